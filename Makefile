@@ -1,0 +1,51 @@
+# A thin front: CMake presets do the work, scripts/setup installs what they need.
+JOBS ?= $(shell nproc)
+PREFIX ?= /usr/local
+FUZZ_SECONDS ?= 60
+
+.PHONY: all run test asan tsan bench fuzz install package clean
+
+all:
+	@scripts/setup build
+	@cmake --preset release >/dev/null
+	cmake --build --preset release -j $(JOBS)
+
+run: all
+	@examples/run build/release/tool/ktfiles
+
+test:
+	@scripts/setup build test bench package
+	@cmake --preset test $(CMAKE_FLAGS) >/dev/null
+	cmake --build --preset test -j $(JOBS)
+	ctest --preset test
+
+asan tsan:
+	@scripts/setup build test bench package
+	@cmake --preset $@ $(CMAKE_FLAGS) >/dev/null
+	cmake --build --preset $@ -j $(JOBS)
+	ctest --preset $@
+
+bench:
+	@scripts/setup build bench
+	@cmake --preset bench >/dev/null
+	cmake --build --preset bench -j $(JOBS)
+	build/bench/bench/ktfiles_bench
+
+fuzz:
+	@scripts/setup build fuzz
+	@cmake --preset fuzz >/dev/null
+	cmake --build --preset fuzz -j $(JOBS)
+	@scripts/fuzz build/fuzz/fuzz $(FUZZ_SECONDS)
+
+install: all
+	cmake --install build/release --prefix $(PREFIX)
+
+package:
+	@scripts/setup build package
+	@cmake --preset release >/dev/null
+	cmake --build --preset release -j $(JOBS)
+	cd build/release && cpack -G DEB
+	@ls -l build/release/*.deb
+
+clean:
+	rm -rf build

@@ -1,0 +1,8 @@
+# What the library stands on, found once; the reasons are in docs/decisions.md.
+
+find_package(PkgConfig REQUIRED)
+pkg_check_modules(uriparser REQUIRED IMPORTED_TARGET liburiparser)
+pkg_check_modules(libxml2 REQUIRED IMPORTED_TARGET libxml-2.0)
+pkg_check_modules(libmd REQUIRED IMPORTED_TARGET libmd)
+find_package(ZLIB REQUIRED)
+find_package(Threads REQUIRED)

@@ -1,0 +1,31 @@
+# What `make install` puts where: the library, its headers by room, the CMake package, the pkg-config file, the command.
+# Three components, which are also the three packages: runtime, development, command.
+
+include(CMakePackageConfigHelpers)
+
+install(TARGETS KTFiles EXPORT KTFilesTargets
+    LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR} COMPONENT runtime NAMELINK_COMPONENT development)
+
+# The headers of implementations (platform/posix/ and the like) are nobody's business.
+foreach(room platform/core platform files audiofile)
+    file(GLOB headers CONFIGURE_DEPENDS ${PROJECT_SOURCE_DIR}/src/${room}/*.h)
+    install(FILES ${headers} DESTINATION ${CMAKE_INSTALL_INCLUDEDIR}/KTFiles/${room} COMPONENT development)
+endforeach()
+
+set(package_folder ${CMAKE_INSTALL_LIBDIR}/cmake/KTFiles)
+install(EXPORT KTFilesTargets NAMESPACE KTFiles:: DESTINATION ${package_folder} COMPONENT development)
+configure_package_config_file(cmake/KTFilesConfig.cmake.in ${PROJECT_BINARY_DIR}/KTFilesConfig.cmake
+    INSTALL_DESTINATION ${package_folder})
+write_basic_package_version_file(${PROJECT_BINARY_DIR}/KTFilesConfigVersion.cmake COMPATIBILITY SameMinorVersion)
+install(FILES ${PROJECT_BINARY_DIR}/KTFilesConfig.cmake ${PROJECT_BINARY_DIR}/KTFilesConfigVersion.cmake
+    DESTINATION ${package_folder} COMPONENT development)
+
+configure_file(cmake/KTFiles.pc.in ${PROJECT_BINARY_DIR}/KTFiles.pc @ONLY)
+install(FILES ${PROJECT_BINARY_DIR}/KTFiles.pc DESTINATION ${CMAKE_INSTALL_LIBDIR}/pkgconfig COMPONENT development)
+
+file(RELATIVE_PATH library_from_command ${CMAKE_INSTALL_FULL_BINDIR} ${CMAKE_INSTALL_FULL_LIBDIR})
+set_target_properties(ktfiles PROPERTIES INSTALL_RPATH "$ORIGIN/${library_from_command}")
+install(TARGETS ktfiles RUNTIME DESTINATION ${CMAKE_INSTALL_BINDIR} COMPONENT command)
+install(FILES tool/ktfiles.1 DESTINATION ${CMAKE_INSTALL_MANDIR}/man1 COMPONENT command)
+install(FILES tool/ktfiles.bash DESTINATION ${CMAKE_INSTALL_DATADIR}/bash-completion/completions RENAME ktfiles
+    COMPONENT command)

@@ -1,0 +1,20 @@
+// Headers of new audio files.
+#pragma once
+
+#include "audiofile/AudioFileInfo.h"
+#include "platform/core/Export.h"
+#include "platform/core/FourCC.h"
+
+#include <cstddef>
+#include <cstdint>
+
+/// Room that a buffer for BuildAudioFileHeader needs.
+inline constexpr std::size_t kMaxAudioFileHeaderSize = 4096;
+
+/// Writes the complete header of a file whose sample data follows it and returns its length in bytes; 0 when it builds
+/// nothing: an unknown type, a format that the type cannot hold, more frames than its size fields can say.
+/// `fileType` is "WAVE" (little-endian; 8 bits unsigned), "AIFF" (big-endian; floats as AIFC), or "caff"
+/// (little-endian). `bits` is 8, 16, 24, 32 or 64, -32 for 32-bit floats; 64 means floats. `channels` of 0 stands for
+/// those of `busFormat`. `option` reserves room ("JUNK") in a WAVE file to grow past 4 GiB, and makes it RF64 once it has.
+KT_EXPORT long BuildAudioFileHeader(void* buffer, FourCC fileType, long long frames, long long sampleRate, int channels,
+                                    int bits, TAudioBusFormat busFormat, bool option);

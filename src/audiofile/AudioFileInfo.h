@@ -1,0 +1,72 @@
+// AudioFileInfo describes an audio file: what its header says, and the loop metadata that hosts ask for most.
+#pragma once
+
+#include "platform/SampleConversion.h"
+#include "platform/core/Export.h"
+#include "platform/core/FourCC.h"
+
+#include <cstdint>
+
+class CFileIO;
+
+/// Bus and channel formats of new files; AudioBusFormatChannels gives their channel counts.
+enum TAudioBusFormat : int {
+    kAudioBusUndefined = 0,
+    kAudioBusMono = 1,
+    kAudioBusStereo = 2,
+    kAudioBusQuad = 3,
+    kAudioBusLCRS = 4,
+    kAudioBus5_1 = 5,
+    kAudioBus6_1 = 6,
+    kAudioBus7_1 = 7,
+    kAudioBus7_1SDDS = 8,
+    kAudioBus5_1_2 = 9,
+    kAudioBus4_0_4 = 10,
+    kAudioBus5_1_4 = 11,
+    kAudioBus7_1_2 = 12,
+    kAudioBus7_1_4 = 13,
+    kAudioBus9_1_4 = 14,
+};
+
+struct KT_EXPORT AudioFileInfo {
+    FourCC fileType = 0; // "WAVE", "AIFF" (AIFC too), "caff", "REX2"; 0 when unknown
+    std::int64_t sampleRate = 44100; // frames per second, rounded
+    std::int32_t bitsPerSample = 16; // 0 for compressed data
+    std::int32_t channels = 1;
+    bool byteSwapped = false; // samples in the other byte order than the host's
+    bool floatingPoint = false;
+    std::int64_t dataOffset = 0; // of the first sample byte; 0 when there is none
+    std::int64_t frames = 0;
+    std::int64_t fileLength = 0;
+
+    // Loop metadata, from the suite's chunks.
+    float beatCount = 0;         // 0: the file carries none
+    std::int32_t timingFlag = 0; // non-zero: the loop's timing is known
+    std::int64_t loopCount = 0;  // at least 1, with loopValue above 0: a tagged loop
+    float loopValue = 0;
+
+    // The container and the stored format.
+    FourCC containerId = 0; // "RIFF", "RF64", "BW64", "FORM", "caff", "CAT "; 0 when unknown
+    FourCC formType = 0;    // "WAVE", "AIFF", "AIFC", "REX2"; 0 for CAF
+    FourCC formatCode = 0;  // "lpcm" for linear PCM; AIFC compression type, CAF format id, WAVE tag as "ms\hh\ll"
+    double exactSampleRate = 44100;
+    platform::SampleFormat sampleFormat; // of linear PCM
+    bool compressed = false;             // described, not decodable as PCM
+    std::int32_t bytesPerFrame = 0;      // of linear PCM; samples left-aligned in their containers
+    std::int64_t dataSize = 0;           // sample bytes that are in the file
+    TAudioBusFormat busFormat = kAudioBusUndefined;
+
+    bool IsLinearPCM() const { return !compressed && bytesPerFrame > 0 && sampleFormat.isSupported(); }
+    /// 5,000 times the tempo in beats per minute, from beat count, rate and frames; 32 low bits.
+    std::uint32_t VireoLoopTempo() const;
+};
+
+/// Describes the file that `file` has open. 0; -39 for a file that ends in its header; kStatusParameterError for one that
+/// is no audio file known here, `info` then holding what was understood (fileType 0, fileLength). `permission` is the
+/// mode that the file was opened with. The mark stays where it was.
+KT_EXPORT std::int32_t GetAudioFileInfo(CFileIO& file, unsigned int permission, AudioFileInfo& info);
+
+/// Channels of a bus format; 0 for values outside 1 to 14.
+KT_EXPORT int AudioBusFormatChannels(int busFormat);
+/// The plainest bus format of that many channels; kAudioBusUndefined when there is none.
+KT_EXPORT TAudioBusFormat AudioBusFormatForChannels(int channels);

@@ -1,0 +1,120 @@
+// CAudioFileIO is a CFileIO opened on an audio file: it knows the file's description, reads and writes its samples, and
+// finds, adds and removes chunks in its container without touching them.
+#pragma once
+
+#include "audiofile/AudioFileInfo.h"
+#include "audiofile/CChunkData.h"
+#include "audiofile/ContainerHeaders.h"
+#include "files/CFileIO.h"
+#include "platform/AudioFileService.h"
+#include "platform/ContentType.h"
+
+#include <functional>
+#include <optional>
+
+/// One chunk of a container as a walk meets it.
+struct ChunkEntry {
+    FourCC id = 0;
+    std::int64_t offset = 0; // of the header
+    std::int64_t size = 0;   // effective size of the body; may run past the end of a damaged file, or be negative
+};
+
+/// Where a container begins and ends.
+struct ContainerExtent {
+    FourCC id = 0; // "RIFF", "RF64", "BW64", "FORM", "caff", "CAT "
+    std::int64_t end = 0;
+    std::int64_t fileLength = 0;
+};
+
+class KT_EXPORT CAudioFileIO : public CFileIO {
+public:
+    CAudioFileIO() = default;
+    /// Stays closed when write access is asked to what has no path, does not exist or is a directory.
+    CAudioFileIO(const CFileRef& ref, unsigned int permission);
+    ~CAudioFileIO() override;
+
+    /// The status of the base open; kStatusFileNotFound for write access to what is missing or a directory.
+    std::int32_t Open(const CFileRef& ref, unsigned int permission);
+    std::int32_t Close();
+    /// Creates (or empties) a file, writes its header for no frames and opens it for writing. `cacheSize` is the read
+    /// cache in KiB; `channels` of 0 stands for those of the bus format; `headerOption` as in BuildAudioFileHeader.
+    std::int32_t CreateAndOpenCommon(const CFileRef& ref, long cacheSize, TAudioBusFormat busFormat, int channels,
+                                     int bitsPerSample, long sampleRate, unsigned int fileType, bool headerOption);
+
+    const AudioFileInfo& Info() const { return mInfo; }
+    /// Bits per sample; -32 for 32-bit floats.
+    std::int32_t SampleFormat() const { return mSampleFormat; }
+
+    /// "WAVE", "AIFF", "REX2", or 0: what kind of chunked container is open. CAF files have a walk of their own and give 0.
+    FourCC IsChunkBased();
+    /// 0, or -3.
+    std::int32_t ReadExtendedFileHeader(ContainerChkExtended& header);
+    /// The position of the chunk after `current`, whose header goes to `next`; position 0 asks for the first. The walk
+    /// is over when the result does not exceed `position` or reaches the container's end.
+    long long NextChunkHeader(long long position, ChkHeader* current, ChkHeader* next, int* error,
+                              const ContainerChkExtended& header);
+    /// Calls `visit` for every chunk in file order until it returns false; CAF too. 0 (also when stopped), -1 not open,
+    /// -2 no container, -3 header unreadable.
+    std::int32_t ForEachChunk(const std::function<bool(const ChunkEntry&)>& visit, ContainerExtent* extent = nullptr);
+
+    /// 1 found, 0 not found, or an error. Of several chunks of an id the last is found; in CAF the first with a size
+    /// above 0. `data` may be null; else it receives an array for delete[].
+    std::int32_t FindChunk(unsigned int id, char** data, long* size, long long* position, long long* next);
+    std::int32_t FindChunk(unsigned int id, CChunkData& chunk);
+    /// The body, or none when it is not found or unreadable.
+    std::optional<Bytes> FindChunk(unsigned int id);
+    /// Puts a chunk behind the container's last; `replace` first removes every chunk of that id. 1 added, 0 no chunked
+    /// container, or an error. Nothing is rolled back on failure.
+    std::int32_t AddChunk(unsigned int id, const void* data, long size, bool replace);
+    std::int32_t AddChunk(const CChunkData& chunk, bool replace);
+    std::int32_t AddChunk(unsigned int id, BytesView data, bool replace);
+    /// Removes every chunk of that id (in CAF the first): one ahead of the samples is renamed "free", others are cut out.
+    std::int32_t RemoveChunk(unsigned int id);
+
+    /// Rewrites the header from the description when samples were written.
+    std::int32_t UpdateHeader();
+    /// Rewrites the header for a number of frames and sets the file's length to match.
+    std::int32_t SetNumFrames(long frames);
+
+    /// Frames from `frame` on as interleaved floats in [-1, 1); `framesRead` (may be null) receives how many were delivered, also on
+    /// failure. kStatusEndOfFile when fewer than asked were there; kStatusParameterError for data that is not linear PCM.
+    std::int32_t ReadFrames(float* to, long long frame, long count, long* framesRead = nullptr);
+    /// Writes interleaved floats at `frame`, which is at most the frame count; the frame count grows, and the header is rewritten by
+    /// UpdateHeader or Close. kStatusFileTooBig when the container cannot hold that many; kStatusParameterError when bytes
+    /// that are no samples lie behind the sample data and would be written over.
+    std::int32_t WriteFrames(const float* from, long long frame, long count);
+
+    /// Reverses the bytes of a value unless the open file is "WAVE".
+    void ByteOrder(int* value) const;
+    void ByteOrder(unsigned int* value) const;
+
+    /// Audio, and not FLAC: FLAC files are deliberately refused.
+    static bool IsSupportedFileType(const platform::String& contentTypeIdentifier);
+    static bool IsSupportedFileType(const platform::ContentType& contentType);
+
+    // A CAF file carries the suite's chunks as "uuid" user-data items: 16 bytes of UUID, then the chunk's body. These
+    // work on a handle of the audio-file service, not on the file that this object has open.
+
+    /// Opens the file for reading and writing and calls `block` with the handle; nothing happens when it cannot be opened.
+    static void PerformAudioFileOperations(const CFileRef& ref, const std::function<void(platform::AudioFile&)>& block);
+    /// `data` and `size` include the UUID and are valid during the call only; `index` is always 0.
+    using UUIDChunkBlock =
+        std::function<void(const unsigned char* uuid, void* data, unsigned int size, int index, bool* stop)>;
+    static void ForAllUUIDChunksPerformBlock(platform::AudioFile& file, const UUIDChunkBlock& block);
+    /// 0 when an item of the UUID is there, else -1; `size` (may be null) receives its size, UUID included.
+    static std::int32_t FindCAFChunkInUUIDChunk(platform::AudioFile& file, const unsigned char* uuid,
+                                                unsigned int* size, void* reserved);
+    /// `data` begins with the UUID, and `size` counts it.
+    static std::int32_t AddCAFChunkToUUIDChunk(platform::AudioFile& file, const unsigned char* uuid, unsigned int size,
+                                               const void* data);
+    static std::int32_t RemoveCAFChunkFromUUIDChunk(platform::AudioFile& file, const unsigned char* uuid);
+
+private:
+    bool IsOpenCAF() const { return mInfo.fileType == kCaff; }
+    // The walk, find and edit steps that the public operations share are declared by their implementation.
+
+    AudioFileInfo mInfo;
+    std::int32_t mSampleFormat = 0;
+    bool mHeaderDirty = false;
+    bool mHeaderOption = false;
+};

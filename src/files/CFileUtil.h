@@ -1,0 +1,11 @@
+// Operations on files named by reference.
+#pragma once
+
+#include "files/CFileRef.h"
+#include "platform/core/FourCC.h"
+
+#include <cstdint>
+
+/// Creates an empty file with the given POSIX permissions (less the process's mask); kStatusDuplicateName when
+/// something is there already. Type and creator codes are accepted and ignored: no file system here keeps them.
+KT_EXPORT std::int32_t CFileUtilCreate(const CFileRef& file, FourCC type, FourCC creator, std::uint32_t permissions);

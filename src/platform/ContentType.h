@@ -1,0 +1,26 @@
+// Content types: identifiers that say what kind of data a file holds, and which kind is a special case of which.
+#pragma once
+
+#include "platform/String.h"
+
+#include <string>
+
+namespace platform {
+
+/// A content type, named by its identifier ("public.audio") or by a MIME type ("audio/flac").
+class KT_EXPORT ContentType {
+public:
+    explicit ContentType(String identifier) : identifier_(std::move(identifier)) {}
+    const String& identifier() const { return identifier_; }
+
+    /// Whether this type is `other` or a special case of it; false when either is unknown.
+    bool conformsTo(const ContentType& other) const;
+
+    static const ContentType& audio();
+    static const ContentType& flac();
+
+private:
+    String identifier_;
+};
+
+} // namespace platform

@@ -1,0 +1,39 @@
+// Linear PCM samples as they stand in files, to and from 32-bit floats.
+#pragma once
+
+#include "platform/core/Export.h"
+
+#include <bit>
+#include <cstddef>
+#include <cstdint>
+
+namespace platform {
+
+/// How one sample is stored. Bits are 8, 16, 24 or 32 for integers, 32 or 64 for floats.
+struct SampleFormat {
+    int bits = 16;
+    bool isFloat = false;
+    bool isUnsigned = false; // 8-bit WAVE, AIFC "raw "
+    std::endian order = std::endian::little;
+
+    int bytesPerSample() const { return (bits + 7) / 8; }
+    bool isSupported() const
+    {
+        return isFloat ? bits == 32 || bits == 64 : bits == 8 || bits == 16 || bits == 24 || bits == 32;
+    }
+    friend bool operator==(const SampleFormat&, const SampleFormat&) = default;
+};
+
+/// `count` samples to floats: integers divided by 2^(bits-1), so that full scale is [-1, 1); floats as they are.
+/// `samples` needs no alignment. The format must be supported.
+KT_EXPORT void samplesToFloat(const void* samples, SampleFormat format, float* to, std::size_t count);
+
+/// `count` floats to samples: integers are rounded half to even and clamped to full scale; a NaN becomes 0. Integers
+/// that came from samplesToFloat come back unchanged (32-bit ones to the 24 bits that a float holds).
+KT_EXPORT void floatToSamples(const float* from, SampleFormat format, void* samples, std::size_t count);
+
+/// The plain roads, without vector instructions: what the fast ones are proven equal to.
+KT_EXPORT void samplesToFloatPlain(const void* samples, SampleFormat format, float* to, std::size_t count);
+KT_EXPORT void floatToSamplesPlain(const float* from, SampleFormat format, void* samples, std::size_t count);
+
+} // namespace platform

@@ -1,0 +1,50 @@
+// The seam to the system: the calls through which the bytes of files travel. Tests replace an entry to make it fail.
+#pragma once
+
+#include "platform/core/Export.h"
+
+#include <cstddef>
+#include <cstdint>
+
+namespace platform {
+
+enum class FileKind { file, directory, symbolicLink, other }; // other: FIFO, socket, device
+
+struct FileStatus {
+    std::uint64_t device = 0;
+    std::uint64_t inode = 0;
+    std::int64_t size = 0;
+    FileKind kind = FileKind::other;
+    std::uint32_t permissions = 0; // the low 12 mode bits
+};
+
+enum class OpenFor { reading, readingAndWriting };
+
+/// Each entry behaves as the system's call of that name: -1 (or false) on failure, with errno saying why. Offsets and
+/// lengths are in bytes.
+struct SystemCalls {
+    /// Opens a regular file without ever blocking on it; `status` receives its status. A directory fails with EISDIR;
+    /// a FIFO, socket or device is not opened at all, and fails with ENXIO.
+    int (*openFile)(const char* path, OpenFor access, FileStatus* status);
+    /// As openFile, but fails with ELOOP when any component of the path is a symbolic link, and with ENOSYS where the
+    /// system cannot tell.
+    int (*openFileWithoutLinks)(const char* path, OpenFor access, FileStatus* status);
+    int (*createFile)(const char* path, std::uint32_t permissions); // O_CREAT | O_EXCL, for writing
+    int (*close)(int descriptor);
+    std::int64_t (*pread)(int descriptor, void* buffer, std::size_t count, std::int64_t offset);
+    std::int64_t (*pwrite)(int descriptor, const void* buffer, std::size_t count, std::int64_t offset);
+    int (*ftruncate)(int descriptor, std::int64_t length);
+    int (*fsync)(int descriptor);
+    /// Reserves space behind the physical end of the file without changing its length.
+    int (*preallocate)(int descriptor, std::int64_t offset, std::int64_t length);
+    /// A hint that what is read will not be read again soon; never makes repeated reads slow.
+    int (*adviseNoReuse)(int descriptor);
+    bool (*status)(int descriptor, FileStatus* status);
+    bool (*pathStatus)(const char* path, FileStatus* status); // follows links
+    bool (*linkStatus)(const char* path, FileStatus* status); // does not
+};
+
+/// The calls in force in this process. Only tests assign to it.
+KT_EXPORT SystemCalls& systemCalls();
+
+} // namespace platform

@@ -1,0 +1,24 @@
+// Decoding of texts that are not Unicode: numbered legacy encodings.
+#pragma once
+
+#include "platform/String.h"
+
+#include <cstdint>
+
+namespace platform {
+
+/// Encoding numbers. 0 is the legacy 8-bit Western encoding (each byte decodes; 0x8A is "ä"), 256 is 16-bit Unicode
+/// (a byte order mark decides, else big-endian).
+using TextEncoding = std::uint32_t;
+inline constexpr TextEncoding kTextEncodingWestern = 0;
+inline constexpr TextEncoding kTextEncodingUnicode16 = 256;
+inline constexpr TextEncoding kTextEncodingUTF8 = 0x08000100;
+
+/// The encoding of C strings on this system: UTF-8.
+KT_EXPORT TextEncoding systemTextEncoding();
+
+/// The text of a C string in `encoding`; null for a null pointer, an unknown encoding, or bytes that it does not know.
+/// A C string in 16-bit Unicode ends at the first 16-bit unit that is zero.
+KT_EXPORT String decodeCString(const char* text, TextEncoding encoding);
+
+} // namespace platform

@@ -1,0 +1,54 @@
+// The one bounded reader for byte layouts with variable tails.
+#pragma once
+
+#include "platform/core/Bytes.h"
+#include "platform/core/FourCC.h"
+#include "platform/core/Packed.h"
+
+#include <bit>
+
+/// Reads fields one after the other from bytes that it does not own. A read past the end yields zero (or an empty
+/// view), moves to the end and makes `ok()` false for good, so that a parser may read a whole record and test once.
+class ByteReader {
+public:
+    explicit ByteReader(BytesView bytes, std::endian order = std::endian::big) : bytes_(bytes), order_(order) {}
+
+    template <class T>
+    T read()
+    {
+        const BytesView field = take(sizeof(T));
+        return field.empty() ? T{} : load<T>(field.data(), order_);
+    }
+
+    /// Ids are four characters in file order, whatever the byte order of the numbers.
+    FourCC readFourCC()
+    {
+        const BytesView field = take(4);
+        return field.empty() ? 0 : loadBE<FourCC>(field.data());
+    }
+
+    /// The next `count` bytes, or an empty view when fewer are left.
+    BytesView take(std::size_t count)
+    {
+        if (count > remaining()) {
+            position_ = bytes_.size();
+            ok_ = false;
+            return {};
+        }
+        const BytesView taken = bytes_.subspan(position_, count);
+        position_ += count;
+        return taken;
+    }
+
+    void skip(std::size_t count) { take(count); }
+    BytesView rest() const { return bytes_.subspan(position_); }
+    std::size_t position() const { return position_; }
+    std::size_t remaining() const { return bytes_.size() - position_; }
+    bool ok() const { return ok_; }
+
+private:
+    BytesView bytes_;
+    std::size_t position_ = 0;
+    std::endian order_;
+    bool ok_ = true;
+};

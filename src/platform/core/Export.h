@@ -1,0 +1,8 @@
+// KT_EXPORT marks what hosts may call; everything else in the library stays hidden.
+#pragma once
+
+#if defined(__GNUC__)
+#define KT_EXPORT __attribute__((visibility("default")))
+#else
+#define KT_EXPORT
+#endif

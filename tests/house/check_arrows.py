@@ -1,0 +1,95 @@
+"""Checks that every #include between rooms follows an arrow of the design, and that no public header shows the system.
+
+A shared include root enforces nothing, so this test does. Usage: check_arrows.py SOURCE_ROOT
+"""
+import pathlib
+import re
+import sys
+
+# Room -> the rooms that it may include, beside itself. An implementation folder of the platform belongs to the room
+# "platform", but only its own .cpp files may include headers of that folder.
+ARROWS = {
+    "platform/core": set(),
+    "platform": {"platform/core"},
+    "files": {"platform"},
+    "loops/tagging": {"platform/core"},
+    "audiofile": {"files", "loops/tagging", "platform"},
+    "loops": {"audiofile", "files", "loops/tagging", "platform"},
+    "adm": {"platform"},
+    "project": {"files", "platform"},
+    "coordination": {"platform"},
+    "files/registry": {"audiofile"},
+}
+SYSTEM_HEADER = re.compile(r"<(sys/|linux/|unistd|fcntl|libxml/|uriparser/|zlib|sha2|iconv|pwd|dirent|errno\.h)")
+INCLUDE = re.compile(r'^\s*#\s*include\s+(?:"([^"]+)"|(<[^>]+>))', re.MULTILINE)
+
+
+def room_of(path):
+    """The room of a path relative to src/: the longest room name that its folder begins with."""
+    folder = path.rsplit("/", 1)[0] if "/" in path else ""
+    rooms = [room for room in ARROWS if folder == room or folder.startswith(room + "/")]
+    return max(rooms, key=len, default=None)
+
+
+def reachable(room):
+    """What a room may include: the arrows, and whatever those rooms build on."""
+    seen, waiting = {room}, [room]
+    while waiting:
+        for target in ARROWS[waiting.pop()] - seen:
+            seen.add(target)
+            waiting.append(target)
+    return seen
+
+
+def problems_of(source, root):
+    relative = source.relative_to(root).as_posix()
+    room = room_of(relative)
+    if room is None:
+        yield f"src/{relative}: in no room of the design"
+        return
+    for ours, system in INCLUDE.findall(source.read_text(encoding="utf-8")):
+        if system:
+            if source.suffix == ".h" and SYSTEM_HEADER.match(system):
+                yield f"src/{relative}: a header includes {system}; system headers stay in .cpp files"
+            continue
+        target = room_of(ours)
+        if target not in reachable(room):
+            yield f"src/{relative}: room {room} may not include {ours}"
+        implementation = ours.count("/") > room_depth(target) if target == "platform" else False
+        if implementation and not relative.startswith(ours.rsplit("/", 1)[0] + "/"):
+            yield f"src/{relative}: {ours} belongs to an implementation"
+
+
+def room_depth(room):
+    return room.count("/") + 1
+
+
+def tool_problems(source, top, public):
+    for ours, _ in INCLUDE.findall(source.read_text(encoding="utf-8")):
+        if ours and not (source.parent / ours).exists() and ours not in public:
+            yield f"{source.relative_to(top)}: {ours} is no public header"
+
+
+def main():
+    top = pathlib.Path(sys.argv[1])
+    root = top / "src"
+    problems, count = [], 0
+    for source in sorted([*root.rglob("*.h"), *root.rglob("*.cpp")]):
+        count += 1
+        problems += problems_of(source, root)
+    public = {
+        header.relative_to(root).as_posix()
+        for room in ARROWS
+        for header in (root / room).glob("*.h")
+    }
+    for folder in ("tool", "examples"):
+        for source in sorted([*(top / folder).rglob("*.h"), *(top / folder).rglob("*.cpp")]):
+            count += 1
+            problems += tool_problems(source, top, public)
+    if count == 0:
+        problems.append("no sources found")
+    print("\n".join(problems) or f"{count} files, every include along an arrow")
+    sys.exit(1 if problems else 0)
+
+
+main()

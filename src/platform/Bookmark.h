@@ -1,4 +1,5 @@
-// Bookmarks: bytes that find a file again after it was renamed or moved.
+// Bookmarks: bytes that find a file again after it was renamed or moved (docs/formats/bookmark.md), and alias files,
+// whose content is a bookmark.
 #pragma once
 
 #include "platform/URL.h"
@@ -33,9 +34,11 @@ struct BookmarkResources {
 /// bytes. Null, with `error`, when the item does not exist or an option cannot be met.
 KT_EXPORT std::optional<Bytes> makeBookmark(const URL& url, BookmarkCreationOptions options, Error* error = nullptr);
 
-/// Finds the item. One that exists at the stored path wins, whatever its inode, since a safe save changes the inode;
-/// otherwise the same inode is looked for in the stored folder, then in the folders around it, by a walk that is
-/// bounded and stays on its file system.
+/// Finds the item. One of the same kind at the stored path wins, whatever its inode, since a safe save changes the
+/// inode; otherwise the same item is looked for in the stored folder and the folder around that, and in their
+/// subfolders, level by level, through at most 20,000 entries of the file system that the bookmark names. Found means
+/// proven: inode numbers are used again, so birth time or kernel handle must agree too. No option changes this:
+/// nothing here asks the user, and nothing is mounted.
 KT_EXPORT ResolvedBookmark resolveBookmark(BytesView bookmark, BookmarkResolutionOptions options,
                                            Error* error = nullptr);
 
@@ -43,5 +46,10 @@ KT_EXPORT BookmarkResources bookmarkResources(BytesView bookmark);
 
 /// Whether the bytes begin as a bookmark does.
 KT_EXPORT bool looksLikeBookmark(BytesView bytes);
+
+/// Whether the item is an alias file: one whose content is bookmark data. Linux desktops have none of their own.
+KT_EXPORT bool isAliasFile(const URL& url);
+/// The bookmark in an alias file; null when the item is no such file.
+KT_EXPORT std::optional<Bytes> bookmarkOfAliasFile(const URL& url);
 
 } // namespace platform

@@ -7,7 +7,8 @@
 
 namespace platform {
 
-/// A content type, named by its identifier ("public.audio") or by a MIME type ("audio/flac").
+/// A content type, named by its identifier ("public.audio") or by a MIME type ("audio/flac"), in any case. Every
+/// subtype of "audio/" is an audio type.
 class KT_EXPORT ContentType {
 public:
     explicit ContentType(String identifier) : identifier_(std::move(identifier)) {}

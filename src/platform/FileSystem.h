@@ -10,8 +10,8 @@
 
 namespace platform {
 
-/// The opaque handle of an existing item: a fixed-size block that finds the item again after it was renamed in its
-/// folder. All zero means none.
+/// The opaque handle of an existing item: a fixed-size block that finds the item again, in the same session of the
+/// system, after it was renamed in its folder. All zero means none.
 struct FileHandle {
     std::array<std::byte, 4160> bytes{};
     friend bool operator==(const FileHandle&, const FileHandle&) = default;
@@ -31,26 +31,24 @@ KT_EXPORT String homeDirectory(const std::string& name);
 /// ".directory" file or of a ".desktop" file in the user's language, else the name itself.
 KT_EXPORT String displayName(const URL& url);
 
-/// An opaque value, comparable for equality, that two items share exactly when they lie on one volume; null on failure.
+/// An opaque value, comparable for equality, that two items share exactly when they lie on one mounted volume; null on
+/// failure. Means nothing once the volume is unmounted.
 KT_EXPORT std::shared_ptr<const Bytes> volumeIdentifier(const URL& url);
 
-/// Whether the item is a folder that a desktop shows as one document: its extension is that of a package.
+/// Whether the item is a folder that is shown as one document: its extension is that of one of the suite's packages.
 KT_EXPORT bool isFilePackage(const String& path);
 
-/// Whether the process may write to the item. Null asks for nothing and gives false.
+/// Whether the process, with its effective user, may write to the item. Null asks for nothing and gives false.
 KT_EXPORT bool isWritable(const char* path);
-
-/// Whether the item is an alias file, whose content is bookmark data. Linux desktops have none: only files that begin
-/// with this system's bookmark header are taken for one.
-KT_EXPORT bool isAliasFile(const URL& url);
 
 /// The URL with every symbolic link of its path resolved; null when the item does not exist.
 KT_EXPORT URLRef resolvingSymbolicLinks(const URL& url);
 
-/// The path with the symbolic links of the part that exists resolved, the rest kept as it is; null stays null.
+/// The path with the symbolic links of the part that exists resolved, the rest kept as it is save for ".", ".." and
+/// double slashes; null stays null, and a relative path is not touched.
 KT_EXPORT String resolvingSymbolicLinksInPath(const String& path);
 
-/// A URL that names the item by path; null when the item does not exist.
+/// A URL that names the item (a symbolic link being one) by its absolute path; null when it does not exist.
 KT_EXPORT URLRef filePathURL(const URLRef& url);
 
 } // namespace platform

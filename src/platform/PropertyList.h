@@ -2,6 +2,7 @@
 #pragma once
 
 #include "platform/core/Error.h"
+#include "platform/core/Export.h"
 #include "platform/core/Value.h"
 
 #include <optional>
@@ -10,13 +11,20 @@ namespace platform {
 
 enum class PropertyListFormat { xml, binary };
 
-/// The bytes of a property list; null, with `error`, when the value holds a null or text that is not UTF-8.
-KT_EXPORT std::optional<Bytes> writePropertyList(const Value& value, PropertyListFormat format,
-                                                 Error* error = nullptr);
+/// How many arrays and dictionaries may stand one within the other, reading and writing.
+inline constexpr int kPropertyListMaximumDepth = 512;
 
-/// Reads a list of either format, told by its first bytes. Memory stays in proportion to the bytes: nesting is limited
-/// to 512 levels, a binary list that refers to one object from many places is refused once the values unfolded from
-/// it pass a multiple of its size, and XML entities other than the five predefined ones are refused.
+/// The bytes of a property list. The same value gives the same bytes. Null, with `error`, when the value holds a null,
+/// text that is not UTF-8, or too deep a nesting; XML refuses besides what it has no form for: control characters other
+/// than tab, line feed and carriage return, U+FFFE and U+FFFF, and dates outside the years 1 to 9999 (it keeps whole
+/// seconds).
+KT_EXPORT std::optional<Bytes> writePropertyList(const Value& value, PropertyListFormat format, Error* error = nullptr);
+
+/// Reads a list of either format, told by its first bytes. Null, with `error`, when it is not whole and sound, or holds
+/// what a `Value` cannot (an integer that needs more than 64 signed bits, a set, an archive's UID). Of two equal keys
+/// the last wins. Memory stays in proportion to the bytes: a binary list may refer to one object from many places, and
+/// is refused once the values unfolded from it need more than 256 times its bytes and 64 KiB; XML entities other
+/// than the five predefined ones, and declarations inside the DOCTYPE, are refused.
 KT_EXPORT std::optional<Value> readPropertyList(BytesView bytes, Error* error = nullptr);
 
 } // namespace platform

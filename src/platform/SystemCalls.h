@@ -23,13 +23,15 @@ enum class OpenFor { reading, readingAndWriting };
 /// Each entry behaves as the system's call of that name: -1 (or false) on failure, with errno saying why. Offsets and
 /// lengths are in bytes.
 struct SystemCalls {
-    /// Opens a regular file without ever blocking on it; `status` receives its status. A directory fails with EISDIR;
-    /// a FIFO, socket or device is not opened at all, and fails with ENXIO.
+    /// Opens a regular file, with its status unless `status` is null, and nothing else: a directory fails with EISDIR;
+    /// a FIFO, socket or device with ENXIO, and never by waiting. Descriptors are not inherited by other programs.
     int (*openFile)(const char* path, OpenFor access, FileStatus* status);
     /// As openFile, but fails with ELOOP when any component of the path is a symbolic link, and with ENOSYS where the
-    /// system cannot tell.
+    /// system cannot tell. Two calls when it succeeds for reading: what is not a regular file may have been opened,
+    /// without waiting for it, and closed again; devices below "/dev" are not.
     int (*openFileWithoutLinks)(const char* path, OpenFor access, FileStatus* status);
-    int (*createFile)(const char* path, std::uint32_t permissions); // O_CREAT | O_EXCL, for writing
+    /// O_CREAT | O_EXCL, for writing; the permissions are those given less the process's mask.
+    int (*createFile)(const char* path, std::uint32_t permissions);
     int (*close)(int descriptor);
     std::int64_t (*pread)(int descriptor, void* buffer, std::size_t count, std::int64_t offset);
     std::int64_t (*pwrite)(int descriptor, const void* buffer, std::size_t count, std::int64_t offset);

@@ -4,6 +4,7 @@
 #include "platform/String.h"
 
 #include <cstdint>
+#include <string_view>
 
 namespace platform {
 
@@ -17,8 +18,11 @@ inline constexpr TextEncoding kTextEncodingUTF8 = 0x08000100;
 /// The encoding of C strings on this system: UTF-8.
 KT_EXPORT TextEncoding systemTextEncoding();
 
-/// The text of a C string in `encoding`; null for a null pointer, an unknown encoding, or bytes that it does not know.
-/// A C string in 16-bit Unicode ends at the first 16-bit unit that is zero.
+/// The text of `bytes` in `encoding`; null for an unknown encoding, or bytes that it does not know.
+KT_EXPORT String decodeText(std::string_view bytes, TextEncoding encoding);
+
+/// The text of a C string in `encoding`; null for a null pointer too. A C string in 16-bit Unicode ends at the first
+/// 16-bit unit that is zero: where only a zero byte is sure to be there, give its bytes to decodeText.
 KT_EXPORT String decodeCString(const char* text, TextEncoding encoding);
 
 } // namespace platform

@@ -13,6 +13,7 @@ public:
     explicit ByteWriter(std::endian order = std::endian::big) : order_(order) {}
 
     template <class T>
+        requires std::is_arithmetic_v<T>
     void write(T value)
     {
         const std::size_t at = bytes_.size();
@@ -29,6 +30,7 @@ public:
 
     void write(BytesView bytes) { bytes_.insert(bytes_.end(), bytes.begin(), bytes.end()); }
     void writeZeros(std::size_t count) { bytes_.resize(bytes_.size() + count); }
+    void reserve(std::size_t count) { bytes_.reserve(count); }
 
     /// Overwrites a field written earlier: a size that is known only at the end.
     template <class T>

@@ -33,9 +33,7 @@ public:
     Value(bool value) : value_(value) {}
     template <class T>
         requires(std::is_integral_v<T> && !std::is_same_v<T, bool>)
-    Value(T value) : value_(static_cast<std::int64_t>(value))
-    {
-    }
+    Value(T value) : value_(static_cast<std::int64_t>(value)) {}
     Value(double value) : value_(value) {}
     Value(Date value) : value_(value) {}
     Value(std::string value) : value_(std::move(value)) {}

@@ -1,0 +1,45 @@
+// What an open AudioFile holds.
+#pragma once
+
+#include "platform/AudioFileService.h"
+#include "platform/audio/AudioDescription.h"
+#include "platform/audio/ChunkScanner.h"
+#include "platform/audio/FileBytes.h"
+
+#include <cstdint>
+#include <optional>
+#include <vector>
+
+namespace platform {
+
+/// Owns the descriptor. Keeps what it read of the container until an edit, or a change of the file's length, makes it
+/// read again.
+struct AudioFile::Implementation {
+    Implementation(int descriptor, Permission access) : bytes(descriptor), isWritable(access == Permission::readWrite)
+    {
+    }
+
+    std::int32_t scan();
+    /// Scans again when the file is not what was scanned.
+    std::int32_t refresh();
+    /// Places, in the layout's list, of the chunks of a type; enumerating them by index stays linear.
+    const std::vector<std::uint32_t>& itemsOf(FourCC type);
+    std::int32_t findItem(FourCC type, std::uint32_t index, const Chunk*& chunk);
+    std::int32_t checkEdit(FourCC type) const;
+    std::int32_t setItem(FourCC type, std::uint32_t index, BytesView body);
+    std::int32_t removeItem(FourCC type, std::uint32_t index);
+
+    std::int32_t describe();
+    std::int32_t extendAudio(std::uint64_t byteCount, std::uint64_t chunkSize);
+    std::int32_t writeAudio(std::uint64_t firstByte, BytesView samples);
+
+    FileBytes bytes;
+    bool isWritable;
+    bool isStale = true;
+    ContainerLayout layout;
+    std::optional<AudioDescription> description;
+    std::optional<FourCC> itemsType;
+    std::vector<std::uint32_t> items;
+};
+
+} // namespace platform

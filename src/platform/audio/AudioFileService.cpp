@@ -1,0 +1,262 @@
+#include "platform/AudioFileService.h"
+
+#include "platform/SystemCalls.h"
+#include "platform/audio/AudioFileImplementation.h"
+#include "platform/audio/UserDataEditor.h"
+#include "platform/core/Status.h"
+
+#include <algorithm>
+#include <array>
+#include <cstdio>
+#include <limits>
+
+namespace platform {
+
+namespace {
+
+/// What makes up a container or tells how to read its samples: no user data to change.
+bool isStructural(ContainerKind kind, FourCC type)
+{
+    static constexpr std::array riff{fourCC("fmt "), fourCC("fact"), fourCC("data"), fourCC("ds64"), fourCC("JUNK")};
+    static constexpr std::array iff{fourCC("COMM"), fourCC("FVER"), fourCC("SSND")};
+    static constexpr std::array caf{fourCC("desc"), fourCC("data"), fourCC("pakt"), fourCC("kuki"), fourCC("chan")};
+    const auto isIn = [type](const auto& types) { return std::ranges::find(types, type) != types.end(); };
+    if (type == 0 || type == ContainerLayout::filler)
+        return true;
+    return kind == ContainerKind::riff ? isIn(riff) : kind == ContainerKind::iff ? isIn(iff) : isIn(caf);
+}
+
+std::int32_t failure()
+{
+    const std::int32_t status = PosixErrorToOSErr();
+    return status != kStatusOK ? status : kStatusIOError;
+}
+
+/// The URL's path as the file system takes it; empty when there is none.
+std::string pathOf(const URL& url)
+{
+    const String path = url.copyFileSystemPath(PathStyle::posix);
+    std::string bytes(path.maximumSizeOfFileSystemRepresentation(), '\0');
+    if (!path.getFileSystemRepresentation(bytes.data(), bytes.size()))
+        return {};
+    bytes.resize(std::char_traits<char>::length(bytes.data()));
+    return bytes;
+}
+
+} // namespace
+
+SampleFormat StreamDescription::sampleFormat() const
+{
+    return {.bits = bitsPerChannel <= 64 ? static_cast<int>(bitsPerChannel) : 0,
+            .isFloat = (formatFlags & isFloat) != 0,
+            .isUnsigned = !(formatFlags & isFloat) && !(formatFlags & isSignedInteger),
+            .order = formatFlags & isBigEndian ? std::endian::big : std::endian::little};
+}
+
+StreamDescription StreamDescription::packedPCM(double sampleRate, std::uint32_t channels, SampleFormat sample)
+{
+    StreamDescription format;
+    format.sampleRate = sampleRate;
+    format.formatId = linearPCM;
+    const bool isUnsigned = sample.isUnsigned || (sample.bits == 8 && sample.order == std::endian::little);
+    format.formatFlags = (sample.isFloat ? isFloat
+                          : isUnsigned   ? 0u
+                                         : isSignedInteger) |
+                         isPacked | (sample.order == std::endian::big ? isBigEndian : 0u);
+    format.bytesPerPacket = format.bytesPerFrame = static_cast<std::uint32_t>(sample.bytesPerSample()) * channels;
+    format.framesPerPacket = 1;
+    format.channelsPerFrame = channels;
+    format.bitsPerChannel = static_cast<std::uint32_t>(sample.bits);
+    return format;
+}
+
+AudioFile::AudioFile(std::unique_ptr<Implementation> implementation) : implementation_(std::move(implementation))
+{
+}
+AudioFile::~AudioFile() = default;
+
+std::unique_ptr<AudioFile> AudioFile::open(const URL& url, Permission permission, FourCC, std::int32_t* status)
+{
+    std::int32_t ignored;
+    std::int32_t& result = status != nullptr ? *status : ignored;
+    const std::string path = pathOf(url);
+    if (path.empty()) {
+        result = kStatusParameterError;
+        return nullptr;
+    }
+    FileStatus found;
+    const OpenFor access = permission == Permission::read ? OpenFor::reading : OpenFor::readingAndWriting;
+    const int descriptor = systemCalls().openFile(path.c_str(), access, &found);
+    if (descriptor < 0) {
+        result = failure();
+        return nullptr;
+    }
+    auto implementation = std::make_unique<Implementation>(descriptor, permission);
+    result = implementation->scan();
+    if (result != kStatusOK)
+        return nullptr;
+    return std::unique_ptr<AudioFile>(new AudioFile(std::move(implementation)));
+}
+
+std::unique_ptr<AudioFile> AudioFile::create(const URL& url, FourCC fileType, const StreamDescription& format,
+                                             std::int32_t* status)
+{
+    std::int32_t ignored;
+    std::int32_t& result = status != nullptr ? *status : ignored;
+    const std::string path = pathOf(url);
+    const Bytes content = newAudioFile(fileType, format);
+    if (path.empty() || content.empty()) {
+        result = kStatusParameterError;
+        return nullptr;
+    }
+    const int descriptor = systemCalls().createFile(path.c_str(), 0666);
+    if (descriptor < 0) {
+        result = failure();
+        return nullptr;
+    }
+    result = FileBytes(descriptor).write(0, content.data(), content.size());
+    std::unique_ptr<AudioFile> file;
+    if (result == kStatusOK)
+        file = open(url, Permission::readWrite, fileType, &result);
+    if (!file)
+        std::remove(path.c_str()); // ours: it was created just now, or creating it had failed
+    return file;
+}
+
+FourCC AudioFile::fileType() const
+{
+    return implementation_->layout.fileType;
+}
+
+std::int32_t AudioFile::Implementation::scan()
+{
+    description.reset();
+    itemsType.reset();
+    isStale = true;
+    const std::int32_t status = scanChunks(bytes, layout);
+    isStale = status != kStatusOK;
+    return status;
+}
+
+std::int32_t AudioFile::Implementation::refresh()
+{
+    std::uint64_t length = 0;
+    if (const std::int32_t status = bytes.length(length); status != kStatusOK)
+        return status;
+    return isStale || length != layout.fileLength ? scan() : kStatusOK;
+}
+
+// User data.
+
+const std::vector<std::uint32_t>& AudioFile::Implementation::itemsOf(FourCC type)
+{
+    if (itemsType != type) {
+        items.clear();
+        if (type != ContainerLayout::filler)
+            for (std::size_t i = 0; i < layout.chunks.size(); ++i)
+                if (layout.chunks[i].id == type)
+                    items.push_back(static_cast<std::uint32_t>(i));
+        itemsType = type;
+    }
+    return items;
+}
+
+std::int32_t AudioFile::Implementation::findItem(FourCC type, std::uint32_t index, const Chunk*& chunk)
+{
+    if (const std::int32_t status = refresh(); status != kStatusOK)
+        return status;
+    const auto& found = itemsOf(type);
+    if (index >= found.size())
+        return kStatusParameterError;
+    chunk = &layout.chunks[found[index]];
+    return kStatusOK;
+}
+
+std::int32_t AudioFile::Implementation::checkEdit(FourCC type) const
+{
+    if (isStructural(layout.kind, type))
+        return kStatusParameterError;
+    return isWritable ? kStatusOK : kStatusWritePermission;
+}
+
+std::int32_t AudioFile::Implementation::setItem(FourCC type, std::uint32_t index, BytesView body)
+{
+    std::int32_t status = checkEdit(type);
+    if (status == kStatusOK)
+        status = scan();
+    if (status != kStatusOK)
+        return status;
+    const auto& found = itemsOf(type);
+    if (index > found.size())
+        return kStatusParameterError;
+    UserDataEditor editor(bytes, layout);
+    status = index < found.size() ? editor.replace(found[index], body) : editor.append(type, body);
+    isStale = true;
+    return status;
+}
+
+std::int32_t AudioFile::Implementation::removeItem(FourCC type, std::uint32_t index)
+{
+    std::int32_t status = checkEdit(type);
+    if (status == kStatusOK)
+        status = scan();
+    if (status != kStatusOK)
+        return status;
+    const auto& found = itemsOf(type);
+    if (index >= found.size())
+        return kStatusParameterError;
+    status = UserDataEditor(bytes, layout).remove(found[index]);
+    isStale = true;
+    return status;
+}
+
+std::int32_t AudioFile::countUserData(FourCC type, std::uint32_t& count)
+{
+    count = 0;
+    // Always from the file: others may have changed it, and whoever enumerates begins here.
+    if (const std::int32_t status = implementation_->scan(); status != kStatusOK)
+        return status;
+    count = static_cast<std::uint32_t>(implementation_->itemsOf(type).size());
+    return kStatusOK;
+}
+
+std::int32_t AudioFile::userDataSize(FourCC type, std::uint32_t index, std::uint32_t& size)
+{
+    size = 0;
+    const Chunk* chunk = nullptr;
+    if (const std::int32_t status = implementation_->findItem(type, index, chunk); status != kStatusOK)
+        return status;
+    if (chunk->size > std::numeric_limits<std::uint32_t>::max())
+        return kStatusFileTooBig;
+    size = static_cast<std::uint32_t>(chunk->size);
+    return kStatusOK;
+}
+
+std::int32_t AudioFile::userData(FourCC type, std::uint32_t index, std::uint32_t& size, void* data)
+{
+    const Chunk* chunk = nullptr;
+    const std::uint32_t capacity = std::exchange(size, 0);
+    if (data == nullptr && capacity > 0)
+        return kStatusParameterError;
+    if (const std::int32_t status = implementation_->findItem(type, index, chunk); status != kStatusOK)
+        return status;
+    const auto count = static_cast<std::uint32_t>(std::min<std::uint64_t>(capacity, chunk->size));
+    const std::int32_t status = implementation_->bytes.read(implementation_->layout.bodyOf(*chunk), data, count);
+    if (status == kStatusOK)
+        size = count;
+    return status;
+}
+
+std::int32_t AudioFile::setUserData(FourCC type, std::uint32_t index, std::uint32_t size, const void* data)
+{
+    if (data == nullptr && size > 0)
+        return kStatusParameterError;
+    return implementation_->setItem(type, index, {static_cast<const std::byte*>(data), size});
+}
+
+std::int32_t AudioFile::removeUserData(FourCC type, std::uint32_t index)
+{
+    return implementation_->removeItem(type, index);
+}
+
+} // namespace platform

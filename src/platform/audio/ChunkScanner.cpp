@@ -1,0 +1,228 @@
+#include "platform/audio/ChunkScanner.h"
+
+#include "platform/core/Packed.h"
+#include "platform/core/Status.h"
+
+#include <algorithm>
+
+namespace platform {
+
+namespace {
+
+constexpr std::size_t kMaximumChunks = std::size_t{1} << 22;
+constexpr std::uint32_t kSizeIs64Bit = 0xFFFFFFFF;
+
+/// Small reads at ascending positions, out of one window: a file of tiny chunks costs few calls.
+class HeaderReader {
+public:
+    explicit HeaderReader(const FileBytes& file) : file_(file) {}
+
+    /// `count` bytes at `position`, or null at the end of the file and on an error, which `status` keeps.
+    const std::byte* at(std::uint64_t position, std::size_t count)
+    {
+        if (position < start_ || position - start_ > held_ || held_ - (position - start_) < count) {
+            start_ = position;
+            held_ = 0;
+            if (const std::int32_t result = file_.readSome(position, window_.data(), window_.size(), held_);
+                result != kStatusOK)
+                status = result;
+            if (held_ < count)
+                return nullptr;
+        }
+        return window_.data() + (position - start_);
+    }
+
+    std::int32_t status = kStatusOK;
+
+private:
+    const FileBytes& file_;
+    std::uint64_t start_ = 0;
+    std::size_t held_ = 0;
+    std::array<std::byte, 4096> window_;
+};
+
+/// What the "ds64" chunk says, if there is one that counts.
+struct Sizes64 {
+    std::uint64_t riffSize = 0;
+    std::uint64_t dataSize = 0;
+    struct Entry {
+        FourCC id;
+        std::uint64_t size;
+    };
+    std::array<Entry, 3> table{};
+    std::size_t tableLength = 0;
+};
+
+class Scan {
+public:
+    Scan(const FileBytes& file, ContainerLayout& layout) : reader_(file), layout_(layout) {}
+
+    std::int32_t run()
+    {
+        const std::byte* start = reader_.at(0, 8);
+        if (start == nullptr)
+            return reader_.status != kStatusOK ? reader_.status : kStatusParameterError;
+        const FourCC id = loadBE<FourCC>(start);
+        if (id == fourCC("caff")) {
+            layout_.kind = ContainerKind::caf;
+            layout_.fileType = id;
+            walkCAF();
+        } else if (!recognize(id)) {
+            return reader_.status != kStatusOK ? reader_.status : kStatusParameterError;
+        } else {
+            walk();
+        }
+        if (layout_.chunks.size() >= kMaximumChunks)
+            return kStatusOutOfMemory;
+        return reader_.status;
+    }
+
+private:
+    bool recognize(FourCC id)
+    {
+        const std::byte* start = reader_.at(0, 12);
+        if (start == nullptr)
+            return false;
+        layout_.fileType = loadBE<FourCC>(start + 8);
+        if (id == fourCC("FORM")) {
+            layout_.kind = ContainerKind::iff;
+            return layout_.fileType == fourCC("AIFF") || layout_.fileType == fourCC("AIFC");
+        }
+        layout_.kind = ContainerKind::riff;
+        return (id == fourCC("RIFF") || id == fourCC("RF64") || id == fourCC("BW64")) &&
+               layout_.fileType == fourCC("WAVE");
+    }
+
+    void readSizes64(FourCC containerId)
+    {
+        const std::byte* first = reader_.at(12, 8 + 28);
+        if (layout_.kind != ContainerKind::riff || first == nullptr)
+            return;
+        const auto id = loadBE<FourCC>(first);
+        const auto size = loadLE<std::uint32_t>(first + 4);
+        layout_.hasReservation = containerId == fourCC("RIFF") && id == fourCC("JUNK") && size >= 28;
+        layout_.hasSizes64 = containerId != fourCC("RIFF") && id == fourCC("ds64") && size >= 28;
+        if (!layout_.hasSizes64)
+            return;
+        sizes64_.riffSize = loadLE<std::uint64_t>(first + 8);
+        sizes64_.dataSize = loadLE<std::uint64_t>(first + 16);
+        const std::size_t length = std::min<std::size_t>({loadLE<std::uint32_t>(first + 32), (size - 28) / 12, 3});
+        const std::byte* table = reader_.at(48, length * 12);
+        for (; table != nullptr && sizes64_.tableLength < length; table += 12)
+            sizes64_.table[sizes64_.tableLength++] = {loadBE<FourCC>(table), loadLE<std::uint64_t>(table + 4)};
+    }
+
+    std::uint64_t effectiveSize(FourCC id, std::uint32_t field) const
+    {
+        if (field != kSizeIs64Bit || !layout_.hasSizes64)
+            return field;
+        if (id == fourCC("data"))
+            return sizes64_.dataSize;
+        for (std::size_t i = 0; i < sizes64_.tableLength; ++i)
+            if (sizes64_.table[i].id == id)
+                return sizes64_.table[i].size;
+        return field;
+    }
+
+    /// Where the container says that it ends; a size that was never filled in means the end of the file.
+    std::uint64_t statedEnd()
+    {
+        const std::byte* start = reader_.at(0, 12);
+        if (start == nullptr)
+            return 0;
+        const auto field = load<std::uint32_t>(start + 4, layout_.order());
+        std::uint64_t size = field;
+        if (field == kSizeIs64Bit)
+            size = layout_.hasSizes64 ? sizes64_.riffSize : 0;
+        return size == 0 || size > layout_.fileLength || size + 8 > layout_.fileLength ? layout_.fileLength : size + 8;
+    }
+
+    void walk()
+    {
+        const std::byte* start = reader_.at(0, 12);
+        readSizes64(start != nullptr ? loadBE<FourCC>(start) : 0);
+        const std::uint64_t limit = statedEnd();
+        layout_.end = 12;
+        while (layout_.end + 8 <= limit) {
+            const std::byte* header = reader_.at(layout_.end, 8);
+            if (header == nullptr) {
+                layout_.isBroken = true; // the file became shorter meanwhile
+                return;
+            }
+            const auto id = loadBE<FourCC>(header);
+            const auto field = load<std::uint32_t>(header + 4, layout_.order());
+            if (!append(id, effectiveSize(id, field)))
+                return;
+            Chunk& chunk = layout_.chunks.back();
+            // Kept: some writers leave the pad byte out. A byte that is not zero begins the next header.
+            if (chunk.size & 1) {
+                const std::byte* pad = reader_.at(layout_.bodyOf(chunk) + chunk.size, 1);
+                chunk.padMissing = pad == nullptr || *pad != std::byte{0};
+            }
+            layout_.end = layout_.nextOf(chunk);
+        }
+    }
+
+    void walkCAF()
+    {
+        layout_.end = 8;
+        while (layout_.end + 12 <= layout_.fileLength) {
+            const std::byte* header = reader_.at(layout_.end, 12);
+            const auto id = header != nullptr ? loadBE<FourCC>(header) : 0;
+            const auto size = header != nullptr ? loadBE<std::int64_t>(header + 4) : std::int64_t{-1};
+            if (size < 0 && !(size == -1 && id == fourCC("data"))) {
+                layout_.isBroken = true;
+                return;
+            }
+            if (!append(id, static_cast<std::uint64_t>(size))) // -1 becomes a size beyond every file
+                return;
+            layout_.end = layout_.nextOf(layout_.chunks.back());
+        }
+    }
+
+    /// Records the chunk at the end; false when there is none, and no more can follow.
+    bool append(FourCC id, std::uint64_t size)
+    {
+        if ((id == 0 && size == 0) || layout_.chunks.size() >= kMaximumChunks) {
+            layout_.isBroken = true;
+            return false;
+        }
+        const std::uint64_t available = layout_.fileLength - layout_.end - layout_.headerSize();
+        layout_.chunks.push_back(
+            {.position = layout_.end, .size = std::min(size, available), .id = id, .sizeIsStale = size > available});
+        return true;
+    }
+
+    HeaderReader reader_;
+    ContainerLayout& layout_;
+    Sizes64 sizes64_;
+};
+
+} // namespace
+
+std::array<std::byte, 12> ContainerLayout::header(FourCC id, std::uint64_t size) const
+{
+    std::array<std::byte, 12> bytes{};
+    storeBE(bytes.data(), id);
+    if (kind == ContainerKind::caf)
+        storeBE(bytes.data() + 4, size);
+    else
+        store(bytes.data() + 4, static_cast<std::uint32_t>(size), order());
+    return bytes;
+}
+
+const Chunk* ContainerLayout::find(FourCC id) const
+{
+    const auto found = std::ranges::find(chunks, id, &Chunk::id);
+    return found == chunks.end() ? nullptr : &*found;
+}
+
+std::int32_t scanChunks(const FileBytes& file, ContainerLayout& layout)
+{
+    layout = {};
+    if (const std::int32_t status = file.length(layout.fileLength); status != kStatusOK)
+        return status;
+    return Scan(file, layout).run();
+}
+
+} // namespace platform

@@ -1,0 +1,393 @@
+#include "platform/audio/UserDataEditor.h"
+
+#include "platform/audio/ChunkEmitter.h"
+#include "platform/audio/ContainerSizes.h"
+#include "platform/core/Status.h"
+
+#include <algorithm>
+#include <numeric>
+#include <utility>
+
+namespace platform {
+
+namespace {
+/// How much of other chunks an edit copies to keep their order; beyond it the edit takes the road without copies.
+constexpr std::uint64_t kLargestCopy = 16 * 1024 * 1024;
+} // namespace
+
+std::int32_t UserDataEditor::replace(std::size_t chunk, BytesView body)
+{
+    const Chunk old = layout_.chunks[chunk]; // a copy: the list changes
+    if (old.size == body.size()) {
+        const std::int32_t status = file_.overwrite(layout_.bodyOf(old), body);
+        rescan();
+        return status;
+    }
+    if (body.size() > layout_.largestChunk())
+        return kStatusFileTooBig;
+    if (layout_.chunks.back().sizeIsStale && layout_.chunks.back().id == ContainerLayout::filler)
+        if (const std::int32_t status = trimEnd(); status != kStatusOK)
+            return status;
+    const Piece piece{old.id, body.size(), body};
+    if (const auto status = placeInFrontOf(chunk, piece))
+        return finish(*status);
+    if (const auto status = placeBehind(chunk, piece))
+        return finish(*status);
+    if (auto content = everythingFrom(chunk + 1)) {
+        content->insert(content->begin(), piece);
+        if (const auto status = placeAtEnd(chunk, *content))
+            return finish(*status);
+    }
+    return finish(replaceByTwoSteps(chunk, piece));
+}
+
+std::int32_t UserDataEditor::append(FourCC id, BytesView body)
+{
+    return body.size() > layout_.largestChunk() ? kStatusFileTooBig : finish(appendPiece({id, body.size(), body}));
+}
+
+std::int32_t UserDataEditor::remove(std::size_t chunk)
+{
+    return finish(hide(chunk));
+}
+
+// What chunks are to an edit.
+
+/// The first chunk stays what it is: in WAVE it may be the place of a "ds64", in CAF it is the description.
+bool UserDataEditor::isFiller(std::size_t chunk) const
+{
+    return chunk > 0 && layout_.chunks[chunk].id == ContainerLayout::filler;
+}
+
+bool UserDataEditor::isMovable(std::size_t chunk) const
+{
+    const Chunk& asked = layout_.chunks[chunk];
+    return chunk > 0 && asked.id != layout_.audioDataId() && !asked.sizeIsStale;
+}
+
+UserDataEditor::Run UserDataEditor::runAround(std::size_t chunk) const
+{
+    std::size_t first = chunk, past = chunk + 1;
+    while (first > 0 && isFiller(first - 1))
+        --first;
+    while (past < layout_.chunks.size() && isFiller(past))
+        ++past;
+    return run(first, past);
+}
+
+UserDataEditor::Run UserDataEditor::run(std::size_t first, std::size_t past) const
+{
+    return {first, past, layout_.chunks[first].position, layout_.nextOf(layout_.chunks[past - 1])};
+}
+
+UserDataEditor::Piece UserDataEditor::pieceOf(std::size_t chunk) const
+{
+    const Chunk& asked = layout_.chunks[chunk];
+    return {asked.id, asked.size, {}, layout_.bodyOf(asked)};
+}
+
+std::uint64_t UserDataEditor::extentOf(const Content& content) const
+{
+    return std::accumulate(
+        content.begin(), content.end(), std::uint64_t{0},
+        [this](std::uint64_t sum, const Piece& piece) { return sum + layout_.extentOf(piece.size); });
+}
+
+/// The chunks from one on, without filler; nullopt when they may not be copied.
+std::optional<UserDataEditor::Content> UserDataEditor::everythingFrom(std::size_t chunk) const
+{
+    Content content;
+    std::uint64_t copied = 0;
+    for (; chunk < layout_.chunks.size(); ++chunk) {
+        if (isFiller(chunk))
+            continue;
+        copied += layout_.chunks[chunk].size;
+        if (!isMovable(chunk) || copied > kLargestCopy)
+            return std::nullopt;
+        content.push_back(pieceOf(chunk));
+    }
+    return content;
+}
+
+// Where new bytes find room.
+
+/// Into filler that stands ahead of a chunk, together with the chunks between them; the rest, through the chunk that
+/// becomes hidden, becomes filler.
+std::optional<std::int32_t> UserDataEditor::placeInFrontOf(std::size_t hidden, const Piece& piece)
+{
+    const std::uint64_t hiddenEnd = hidden < layout_.chunks.size() ? runAround(hidden).end : layout_.end;
+    Content backwards{piece};
+    std::uint64_t copied = 0;
+    for (std::size_t i = hidden; i-- > 1;) {
+        if (isFiller(i)) {
+            const Run filler = runAround(i);
+            if (const auto status = fillFront(filler, hiddenEnd, {backwards.rbegin(), backwards.rend()}))
+                return status;
+            i = filler.first;
+            continue;
+        }
+        copied += layout_.chunks[i].size;
+        if (!isMovable(i) || copied > kLargestCopy)
+            break;
+        backwards.push_back(pieceOf(i));
+    }
+    return std::nullopt;
+}
+
+/// Into filler that stands behind a chunk, together with the chunks between them; all ahead of it becomes filler.
+std::optional<std::int32_t> UserDataEditor::placeBehind(std::size_t hidden, const Piece& piece)
+{
+    const std::uint64_t hiddenFrom = runAround(hidden).position;
+    Content content{piece};
+    std::uint64_t copied = 0;
+    for (std::size_t i = hidden + 1; i < layout_.chunks.size(); ++i) {
+        if (isFiller(i)) {
+            const Run filler = runAround(i);
+            if (const auto status = fillBehind(hiddenFrom, filler, content))
+                return status;
+            i = filler.past - 1;
+            continue;
+        }
+        copied += layout_.chunks[i].size;
+        if (!isMovable(i) || copied > kLargestCopy)
+            break;
+        content.push_back(pieceOf(i));
+    }
+    return std::nullopt;
+}
+
+/// Into filler between two places of the list, where nothing is hidden for it.
+std::optional<std::int32_t> UserDataEditor::placeBetween(std::size_t first, std::size_t past, const Piece& piece)
+{
+    for (std::size_t i = first; i < past; ++i) {
+        if (!isFiller(i))
+            continue;
+        const Run filler = runAround(i);
+        if (const auto status = fillFront(filler, filler.end, {piece}))
+            return status;
+        i = filler.past - 1;
+    }
+    return std::nullopt;
+}
+
+/// Behind the last chunk; everything from a chunk on is hidden, and comes back in the content.
+std::optional<std::int32_t> UserDataEditor::placeAtEnd(std::size_t hiddenFrom, const Content& content)
+{
+    const std::uint64_t position = runAround(hiddenFrom).position;
+    const std::uint64_t extent = layout_.headerSize() + extentOf(content);
+    if (layout_.end + 1 - position > layout_.largestChunk())
+        return std::nullopt;
+    if (const std::int32_t status = grow(extent); status != kStatusOK)
+        return status;
+    const std::size_t last = layout_.chunks.size() - 1;
+    return fillBehind(position, run(last, last + 1), content);
+}
+
+// How it is written.
+
+/// Writes the content over the front of filler. The header of its first chunk comes last: until then the filler hides
+/// everything, afterwards new filler behind the content hides the rest, up to `hiddenEnd`.
+std::optional<std::int32_t> UserDataEditor::fillFront(const Run& filler, std::uint64_t hiddenEnd,
+                                                      const Content& content)
+{
+    const std::uint64_t room = filler.end - filler.position;
+    const std::uint64_t extent = extentOf(content);
+    const bool exact = extent == room && hiddenEnd == filler.end;
+    if (!exact && extent + layout_.headerSize() > room)
+        return std::nullopt;
+    const std::uint64_t restSize = exact ? 0 : hiddenEnd - filler.position - extent - layout_.headerSize();
+    if (restSize > layout_.largestChunk() || room > layout_.largestChunk())
+        return std::nullopt;
+    if (const std::int32_t status = mergeFiller(filler); status != kStatusOK)
+        return status;
+
+    ChunkEmitter emitter(file_, layout_, filler.position + layout_.headerSize());
+    for (const Piece& piece : content) {
+        if (&piece != &content.front())
+            emitter.header(piece.id, piece.size);
+        piece.bodyInFile ? emitter.copy(*piece.bodyInFile, piece.size) : emitter.bytes(piece.newBody);
+        emitter.pad(piece.size);
+    }
+    if (!exact)
+        emitter.header(ContainerLayout::filler, restSize);
+    if (const std::int32_t status = emitter.flush(); status != kStatusOK)
+        return status;
+    if (const std::int32_t status = file_.flush(); status != kStatusOK)
+        return status;
+    return writeHeader(filler.position, content.front().id, content.front().size);
+}
+
+/// Writes the content inside filler; then one header makes filler of all between `hiddenFrom` and the content.
+std::optional<std::int32_t> UserDataEditor::fillBehind(std::uint64_t hiddenFrom, const Run& filler,
+                                                       const Content& content)
+{
+    const std::uint64_t start = filler.position + layout_.headerSize();
+    const std::uint64_t end = start + extentOf(content);
+    if (end != filler.end && end + layout_.headerSize() > filler.end)
+        return std::nullopt;
+    if (filler.end - hiddenFrom > layout_.largestChunk())
+        return std::nullopt;
+    if (const std::int32_t status = mergeFiller(filler); status != kStatusOK)
+        return status;
+
+    ChunkEmitter emitter(file_, layout_, start);
+    for (const Piece& piece : content) {
+        emitter.header(piece.id, piece.size);
+        piece.bodyInFile ? emitter.copy(*piece.bodyInFile, piece.size) : emitter.bytes(piece.newBody);
+        emitter.pad(piece.size);
+    }
+    if (end != filler.end)
+        emitter.header(ContainerLayout::filler, filler.end - end - layout_.headerSize());
+    if (const std::int32_t status = emitter.flush(); status != kStatusOK)
+        return status;
+    if (const std::int32_t status = file_.flush(); status != kStatusOK)
+        return status;
+    return writeHeader(hiddenFrom, ContainerLayout::filler, start - hiddenFrom - layout_.headerSize());
+}
+
+/// For a chunk that the samples hold apart from all room: the new one first, then the old one becomes filler. Between
+/// the two both are there, the old one first.
+std::int32_t UserDataEditor::replaceByTwoSteps(std::size_t chunk, const Piece& piece)
+{
+    const auto begin = layout_.chunks.begin();
+    const auto following = [&](auto from) {
+        return std::find_if(from, layout_.chunks.end(), [&](const Chunk& other) { return other.id == piece.id; });
+    };
+    const auto next = static_cast<std::size_t>(following(begin + static_cast<std::ptrdiff_t>(chunk) + 1) - begin);
+    std::optional<std::int32_t> status;
+    bool isNext = true; // the new one becomes the next of its type
+    if (next < layout_.chunks.size()) {
+        status = placeBetween(chunk + 1, next, piece);
+        if (auto content = everythingFrom(next); !status && content) {
+            content->insert(content->begin(), piece);
+            status = placeAtEnd(next, *content);
+        }
+        isNext = status.has_value();
+    }
+    if (!status)
+        status = appendPiece(piece);
+    if (*status != kStatusOK)
+        return *status;
+
+    // The old one stands ahead of all that changed, so that its place in the list is the same.
+    if (*status = rescan(); *status == kStatusOK)
+        *status = file_.flush();
+    if (*status == kStatusOK)
+        *status = hide(chunk);
+    if (*status == kStatusOK || rescan() != kStatusOK)
+        return *status;
+    for (std::size_t i = isNext ? chunk + 1 : layout_.chunks.size() - 1; i < layout_.chunks.size(); isNext ? ++i : --i)
+        if (layout_.chunks[i].id == piece.id) {
+            hide(i);
+            break;
+        }
+    return *status;
+}
+
+std::int32_t UserDataEditor::appendPiece(const Piece& piece)
+{
+    if (const std::int32_t status = trimEnd(); status != kStatusOK)
+        return status;
+    const std::size_t count = layout_.chunks.size();
+    std::size_t behindItsType = count;
+    while (behindItsType > 0 && layout_.chunks[behindItsType - 1].id != piece.id)
+        --behindItsType;
+    if (const auto status = placeBetween(behindItsType, count, piece))
+        return *status;
+    // Moving the last chunks into filler ahead of them keeps a file from growing with every edit.
+    if (!layout_.isBroken)
+        if (const auto status = placeInFrontOf(count, piece))
+            return *status;
+    if (const std::int32_t status = grow(layout_.extentOf(piece.size)); status != kStatusOK)
+        return status;
+    const Run filler = run(count, count + 1);
+    return *fillFront(filler, filler.end, {piece});
+}
+
+/// Makes filler of a chunk, and one filler of it and its neighbours.
+std::int32_t UserDataEditor::hide(std::size_t chunk)
+{
+    Run hidden = runAround(chunk);
+    if (hidden.end - hidden.position > layout_.largestChunk())
+        hidden = run(chunk, chunk + 1);
+    const std::uint64_t size = hidden.end - hidden.position - layout_.headerSize();
+    return size <= layout_.largestChunk() ? writeHeader(hidden.position, ContainerLayout::filler, size)
+                                          : kStatusFileTooBig;
+}
+
+/// Puts filler of this extent, header included, behind the last chunk.
+std::int32_t UserDataEditor::grow(std::uint64_t extent)
+{
+    if (layout_.isBroken || extent > layout_.largestChunk())
+        return layout_.isBroken ? kStatusIOError : kStatusFileTooBig;
+    if (layout_.chunks.empty() && layout_.kind == ContainerKind::caf)
+        return kStatusIOError; // the description must be the first chunk
+    if (const std::int32_t status = checkContainerEnd(layout_, layout_.end + 1 + extent); status != kStatusOK)
+        return status;
+    // The bytes behind the container are nobody's, unless they are samples whose size was never filled in.
+    if (!layout_.chunks.empty() && layout_.chunks.back().id == layout_.audioDataId() &&
+        layout_.chunks.back().size == 0 && hasForeignTail(file_, layout_))
+        return kStatusIOError;
+    if (const std::int32_t status = settleLastChunk(file_, layout_); status != kStatusOK)
+        return status;
+
+    const Chunk filler{.position = layout_.end, .size = extent - layout_.headerSize(), .id = ContainerLayout::filler};
+    const std::uint64_t formerLength = layout_.fileLength;
+    // In CAF the header is in force at once, and the file catches up with it; elsewhere nobody looks there yet.
+    std::int32_t status = file_.write(filler.position, layout_.header(filler.id, filler.size).data(),
+                                      static_cast<std::size_t>(layout_.headerSize()));
+    if (status == kStatusOK)
+        status = file_.setLength(filler.position + extent);
+    if (status == kStatusOK)
+        status = writeContainerEnd(file_, layout_, filler.position + extent);
+    if (status != kStatusOK) {
+        file_.setLength(std::max(formerLength, filler.position));
+        return status;
+    }
+    layout_.chunks.push_back(filler);
+    layout_.fileLength = layout_.end = filler.position + extent;
+    return kStatusOK;
+}
+
+std::int32_t UserDataEditor::mergeFiller(const Run& filler)
+{
+    return filler.past - filler.first == 1 ? kStatusOK
+                                           : writeHeader(filler.position, ContainerLayout::filler,
+                                                         filler.end - filler.position - layout_.headerSize());
+}
+
+std::int32_t UserDataEditor::writeHeader(std::uint64_t position, FourCC id, std::uint64_t size)
+{
+    const auto header = layout_.header(id, size);
+    return file_.overwrite(position, BytesView(header).first(static_cast<std::size_t>(layout_.headerSize())));
+}
+
+/// The edit is done, or undone, before this: what is left is filler at the end, and a failure to cut it off harms
+/// nobody.
+std::int32_t UserDataEditor::finish(std::int32_t status)
+{
+    if (rescan() == kStatusOK)
+        trimEnd();
+    return status;
+}
+
+/// Cuts filler off the end of the container. That it cannot be cut is no failure, that the file cannot be read is.
+std::int32_t UserDataEditor::trimEnd()
+{
+    std::size_t first = layout_.chunks.size();
+    while (first > 0 && isFiller(first - 1))
+        --first;
+    if (first == layout_.chunks.size() || layout_.end < layout_.fileLength)
+        return kStatusOK; // nothing to cut, or bytes behind it that are not ours
+    const std::uint64_t end = layout_.chunks[first].position;
+    if (file_.flush() == kStatusOK && writeContainerEnd(file_, layout_, end) == kStatusOK)
+        file_.setLength(end);
+    return rescan();
+}
+
+std::int32_t UserDataEditor::rescan()
+{
+    return scanChunks(file_, layout_);
+}
+
+} // namespace platform

@@ -1,0 +1,90 @@
+#include "platform/FileSystem.h"
+
+#include "platform/posix/AbsolutePath.h"
+
+#include <climits>
+#include <cstdlib>
+#include <memory>
+
+namespace platform {
+
+namespace {
+
+/// False when no such item exists.
+bool resolve(const char* path, std::string& resolved)
+{
+    char buffer[PATH_MAX];
+    if (::realpath(path, buffer) == nullptr)
+        return false;
+    resolved = buffer;
+    return true;
+}
+
+/// Appends the components of `rest` to `path`, by their text alone.
+void appendComponents(std::string& path, std::string_view rest)
+{
+    while (!rest.empty()) {
+        const std::size_t slash = rest.find('/');
+        const std::string_view component = rest.substr(0, slash);
+        rest.remove_prefix(slash == rest.npos ? rest.size() : slash + 1);
+        if (component.empty() || component == ".")
+            continue;
+        if (component == "..") {
+            path.erase(path.rfind('/'));
+        } else {
+            if (path != "/")
+                path += '/';
+            path += component;
+        }
+        if (path.empty())
+            path = "/";
+    }
+}
+
+} // namespace
+
+URLRef resolvingSymbolicLinks(const URL& url)
+{
+    const std::string& path = absolutePath(url);
+    std::string resolved;
+    FileStatus status;
+    if (path.empty() || !resolve(path.c_str(), resolved) || !systemCalls().pathStatus(resolved.c_str(), &status))
+        return nullptr;
+    return URL::createWithFileSystemPath(String::fromUTF8(resolved), PathStyle::posix,
+                                         status.kind == FileKind::directory);
+}
+
+String resolvingSymbolicLinksInPath(const String& path)
+{
+    const std::string& whole = path.utf8();
+    if (!whole.starts_with('/'))
+        return path;
+    std::string resolved;
+    if (!resolve(whole.c_str(), resolved)) {
+        // Shorten the path until what is left exists; "/" always does. A link whose target is missing stays as it is.
+        std::size_t end = whole.size();
+        do
+            end = whole.rfind('/', end - 1);
+        while (end > 0 && !resolve(whole.substr(0, end).c_str(), resolved));
+        if (end == 0)
+            resolved = "/";
+        appendComponents(resolved, std::string_view(whole).substr(end));
+    }
+    String text = String::fromUTF8(resolved);
+    return text.isNull() ? path : text; // a link may lead into a folder whose name is no text
+}
+
+URLRef filePathURL(const URLRef& url)
+{
+    if (!url)
+        return nullptr;
+    const std::string& path = absolutePath(*url);
+    FileStatus status;
+    if (path.empty() || !systemCalls().linkStatus(path.c_str(), &status))
+        return nullptr;
+    if (url->baseURL() == nullptr && url->isFileURL())
+        return url;
+    return URL::createWithFileSystemPath(String::fromUTF8(path), PathStyle::posix, url->hasDirectoryPath());
+}
+
+} // namespace platform

@@ -1,0 +1,212 @@
+#include "platform/Bookmark.h"
+#include "platform/FileSystem.h"
+#include "platform/posix/ItemSearch.h"
+#include "support/TemporaryFolder.h"
+
+#include <gtest/gtest.h>
+
+#include <cerrno>
+
+namespace fs = std::filesystem;
+using namespace platform;
+
+namespace {
+
+URLRef urlOf(const std::string& path, bool isDirectory = false)
+{
+    return URL::createWithFileSystemPath(String::fromUTF8(path), PathStyle::posix, isDirectory);
+}
+
+std::string pathOf(const URLRef& url)
+{
+    return url ? url->copyFileSystemPath(PathStyle::posix).utf8() : "(none)";
+}
+
+class BookmarkTest : public ::testing::Test {
+protected:
+    void SetUp() override
+    {
+        fs::create_directories(folder / "songs/one/loops");
+        fs::create_directories(folder / "songs/two/loops/drums");
+        file = folder.write("songs/one/loops/beat.wav", "beat");
+        const auto made = makeBookmark(*urlOf(file), {});
+        ASSERT_TRUE(made);
+        bookmark = *made;
+    }
+
+    void expectFoundAt(const std::string& path, bool isStale) const
+    {
+        Error error;
+        const ResolvedBookmark resolved = resolveBookmark(bookmark, {}, &error);
+        EXPECT_EQ(pathOf(resolved.url), path) << error.description;
+        EXPECT_EQ(resolved.isStale, isStale);
+    }
+
+    TemporaryFolder folder;
+    std::string file;
+    Bytes bookmark;
+};
+
+} // namespace
+
+TEST_F(BookmarkTest, FindsTheFileWhereItWas)
+{
+    expectFoundAt(file, false);
+    const BookmarkResources resources = bookmarkResources(bookmark);
+    EXPECT_EQ(resources.path.utf8(), file);
+    EXPECT_FALSE(resources.isDirectory);
+}
+
+TEST_F(BookmarkTest, FindsTheFileAfterARenameOrAMoveNearby)
+{
+    for (const char* name : {"songs/one/loops/groove.wav", "songs/one/beat.wav", "songs/one/loops2/x/beat.wav"}) {
+        fs::create_directories(fs::path(folder / name).parent_path());
+        fs::rename(file, folder / name);
+        expectFoundAt(folder / name, true);
+        fs::rename(folder / name, file);
+    }
+    fs::rename(folder / "songs/one/loops", folder / "songs/one/renamed"); // with the folder that it lies in
+    expectFoundAt(folder / "songs/one/renamed/beat.wav", true);
+}
+
+TEST_F(BookmarkTest, DoesNotSearchBeyondTheFoldersAround)
+{
+    fs::rename(file, folder / "songs/two/beat.wav");
+    expectFoundAt("(none)", false);
+}
+
+TEST_F(BookmarkTest, AFolderIsFoundAgainAsAFolder)
+{
+    bookmark = makeBookmark(*urlOf(folder / "songs/two/loops", true), {}).value();
+    EXPECT_TRUE(bookmarkResources(bookmark).isDirectory);
+    fs::rename(folder / "songs/two/loops", folder / "songs/two/moved");
+    expectFoundAt(folder / "songs/two/moved", true);
+    EXPECT_TRUE(resolveBookmark(bookmark, {}).url->hasDirectoryPath());
+}
+
+TEST_F(BookmarkTest, ASafelySavedFileWinsOverTheOldOneElsewhere)
+{
+    fs::rename(file, folder / "songs/one/loops/backup.wav");
+    folder.write("songs/one/loops/beat.wav", "a new take");
+    expectFoundAt(file, true);
+}
+
+TEST_F(BookmarkTest, AFolderInTheFilesPlaceIsNoSubstitute)
+{
+    fs::rename(file, folder / "songs/one/beat.wav");
+    fs::create_directory(file);
+    expectFoundAt(folder / "songs/one/beat.wav", true);
+}
+
+TEST_F(BookmarkTest, AnInodeUsedAgainIsNotTakenForTheFile)
+{
+    // The bytes of a bookmark whose file is gone and whose inode another file has now: the inode number is right, birth
+    // time and handle are not.
+    const std::string other = folder.write("songs/one/loops/other.wav", "another file");
+    const Bytes ofOther = makeBookmark(*urlOf(other), {}).value();
+    std::copy_n(ofOther.begin() + 16, 8, bookmark.begin() + 16);
+    fs::remove(file);
+    expectFoundAt("(none)", false);
+}
+
+TEST_F(BookmarkTest, LinksAreNotFollowedOnTheSearch)
+{
+    fs::create_directory(folder / "elsewhere");
+    fs::rename(file, folder / "elsewhere/beat.wav");
+    fs::create_directory_symlink(folder / "elsewhere", folder / "songs/one/loops/shortcut");
+    expectFoundAt("(none)", false);
+}
+
+TEST_F(BookmarkTest, TheSearchIsBoundedInEntries)
+{
+    const ItemIdentity item = itemIdentity(file.c_str()).value();
+    folder.write("songs/one/a", "");
+    folder.write("songs/one/b", ""); // with "loops" three entries; the file is the fourth
+    EXPECT_EQ(findItem(item, {folder / "songs/one"}, SearchDepth::withSubfolders, 3), std::nullopt);
+    EXPECT_EQ(findItem(item, {folder / "songs/one"}, SearchDepth::withSubfolders, 4), file);
+    EXPECT_EQ(findItem(item, {folder / "songs/one"}, SearchDepth::folderOnly, 100), std::nullopt);
+}
+
+TEST_F(BookmarkTest, ABookmarkOfALinkIsOfTheLink)
+{
+    const std::string link = folder / "songs/one/link.wav";
+    fs::create_symlink("nowhere", link);
+    bookmark = makeBookmark(*urlOf(link), {}).value();
+    expectFoundAt(link, false);
+    fs::rename(link, folder / "songs/one/link2.wav");
+    expectFoundAt(folder / "songs/one/link2.wav", true);
+}
+
+TEST_F(BookmarkTest, WhatCannotBeBookmarkedSaysWhy)
+{
+    Error error;
+    EXPECT_FALSE(makeBookmark(*urlOf(file), {.securityScope = true}, &error));
+    EXPECT_EQ(error.code, ENOTSUP);
+    EXPECT_FALSE(makeBookmark(*urlOf(folder / "missing.wav"), {}, &error));
+    EXPECT_EQ(error.code, ENOENT);
+    EXPECT_FALSE(makeBookmark(*URL::createWithString("http://example.com/a"), {}, &error));
+    EXPECT_EQ(error.code, EINVAL);
+    EXPECT_FALSE(makeBookmark(*urlOf("relative.wav"), {}, &error));
+}
+
+TEST_F(BookmarkTest, DamagedBytesAreRefusedAndNeverHarm)
+{
+    const std::size_t handleSize = std::to_integer<std::size_t>(bookmark[41]);
+    const auto refused = [](Bytes bytes) {
+        return !resolveBookmark(bytes, {}).url && bookmarkResources(bytes).path.isNull();
+    };
+    for (std::size_t size = 0; size < bookmark.size(); ++size)
+        EXPECT_TRUE(refused(Bytes(bookmark.begin(), bookmark.begin() + static_cast<std::ptrdiff_t>(size)))) << size;
+    Bytes longer = bookmark;
+    longer.push_back({});
+    EXPECT_TRUE(refused(longer));
+
+    struct Damage {
+        std::size_t offset;
+        int value;
+    };
+    for (const Damage damage : {Damage{0, 'K'},
+                                {5, 2},
+                                {40, 0xFF},
+                                {41, 129},
+                                {42, 0xFF},
+                                {43, 0},
+                                {44 + handleSize, 'a'},
+                                {46 + handleSize, 0},
+                                {46 + handleSize, 0xFF}}) {
+        Bytes damaged = bookmark;
+        damaged[damage.offset] = std::byte(damage.value);
+        EXPECT_TRUE(refused(damaged)) << damage.offset;
+    }
+    // Any one bit: whatever comes out, it comes out without harm.
+    for (std::size_t bit = 0; bit < bookmark.size() * 8; ++bit) {
+        Bytes damaged = bookmark;
+        damaged[bit / 8] ^= std::byte(1 << bit % 8);
+        bookmarkResources(damaged);
+    }
+}
+
+TEST_F(BookmarkTest, TheFormatIsTheDocumentedOne)
+{
+    const std::size_t handleSize = std::to_integer<std::size_t>(bookmark[41]);
+    EXPECT_EQ(textOf(bookmark).substr(0, 8), std::string_view("ktbm\0\1\0\0", 8));
+    EXPECT_EQ(textOf(bookmark).substr(44 + handleSize), file);
+    std::uint64_t inode = 0;
+    for (std::size_t i = 16; i < 24; ++i)
+        inode = inode << 8 | std::to_integer<std::uint64_t>(bookmark[i]);
+    FileStatus status;
+    ASSERT_TRUE(systemCalls().linkStatus(file.c_str(), &status));
+    EXPECT_EQ(inode, status.inode);
+}
+
+TEST_F(BookmarkTest, AliasFilesAreToldByTheirContent)
+{
+    const std::string alias = folder.write("alias", bookmark);
+    EXPECT_EQ(bookmarkOfAliasFile(*urlOf(alias)), bookmark);
+    EXPECT_FALSE(isAliasFile(*urlOf(file)));
+    EXPECT_FALSE(isAliasFile(*urlOf(folder.write("large", "ktbm\0\1" + std::string(10000, '\0')))));
+    EXPECT_FALSE(isAliasFile(*urlOf(folder / "songs", true)));
+    EXPECT_FALSE(isAliasFile(*urlOf(folder / "missing")));
+    fs::create_symlink(alias, folder / "link");
+    EXPECT_FALSE(isAliasFile(*urlOf(folder / "link")));
+}

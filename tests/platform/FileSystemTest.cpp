@@ -1,0 +1,159 @@
+#include "platform/FileSystem.h"
+#include "support/TemporaryFolder.h"
+
+#include <gtest/gtest.h>
+
+#include <cstdlib>
+
+namespace fs = std::filesystem;
+using namespace platform;
+
+namespace {
+
+URLRef urlOf(const std::string& path, bool isDirectory = false)
+{
+    return URL::createWithFileSystemPath(String::fromUTF8(path), PathStyle::posix, isDirectory);
+}
+
+std::string pathOf(const URLRef& url)
+{
+    return url ? url->copyFileSystemPath(PathStyle::posix).utf8() : "(none)";
+}
+
+} // namespace
+
+TEST(FileHandle, FindsTheItemAfterARenameInItsFolder)
+{
+    const TemporaryFolder folder;
+    const std::string path = folder.write("take.wav", "one");
+    FileHandle handle;
+    ASSERT_TRUE(makeFileHandle(path.c_str(), handle));
+    EXPECT_EQ(pathOf(urlFromFileHandle(handle)), path);
+    EXPECT_EQ(catalogName(handle).utf8(), "take.wav");
+
+    // Another file takes the name; the handle stays with the item.
+    fs::rename(path, folder / "renamed.wav");
+    folder.write("take.wav", "two");
+    EXPECT_EQ(pathOf(urlFromFileHandle(handle)), folder / "renamed.wav");
+    EXPECT_EQ(catalogName(handle).utf8(), "renamed.wav");
+
+    fs::remove(folder / "renamed.wav");
+    EXPECT_EQ(urlFromFileHandle(handle), nullptr);
+    EXPECT_TRUE(catalogName(handle).isNull());
+}
+
+TEST(FileHandle, IsZeroWhenThereIsNoItem)
+{
+    FileHandle handle;
+    ASSERT_TRUE(makeFileHandle("/", handle));
+    EXPECT_EQ(catalogName(handle).utf8(), "/");
+    EXPECT_TRUE(urlFromFileHandle(handle)->hasDirectoryPath());
+    for (const char* path : {"/no/such/item", "relative", "", static_cast<const char*>(nullptr)}) {
+        ASSERT_TRUE(makeFileHandle("/", handle));
+        EXPECT_FALSE(makeFileHandle(path, handle));
+        EXPECT_EQ(handle, FileHandle());
+    }
+    EXPECT_EQ(urlFromFileHandle(FileHandle()), nullptr);
+    FileHandle noise;
+    noise.bytes.fill(std::byte(0x2F));
+    EXPECT_EQ(urlFromFileHandle(noise), nullptr);
+}
+
+TEST(HomeDirectory, IsThatOfTheUserDatabase)
+{
+    EXPECT_EQ(homeDirectory("root").utf8(), "/root");
+    EXPECT_TRUE(homeDirectory("no-such-user").isNull());
+    ::setenv("HOME", "/elsewhere", 1);
+    EXPECT_NE(homeDirectory("").utf8(), "/elsewhere");
+}
+
+TEST(SymbolicLinks, AreResolvedAsFarAsThePathExists)
+{
+    const TemporaryFolder folder;
+    fs::create_directories(folder / "real/inner");
+    folder.write("real/file", "");
+    fs::create_directory_symlink("real", folder / "link");
+    fs::create_symlink("gone", folder / "dangling");
+    fs::create_symlink("loop", folder / "loop");
+
+    struct Case {
+        const char* path;
+        const char* expected;
+    };
+    const Case cases[] = {{"link/file", "real/file"},
+                          {"link/inner/../file", "real/file"},
+                          {"link/missing/x", "real/missing/x"},
+                          {"link/missing/../other//y/.", "real/other/y"},
+                          {"dangling", "dangling"},
+                          {"loop/x", "loop/x"},
+                          {"link/file/below-a-file", "real/file/below-a-file"}};
+    for (const Case& c : cases)
+        EXPECT_EQ(resolvingSymbolicLinksInPath(String::fromUTF8(folder / c.path)).utf8(), folder / c.expected)
+            << c.path;
+    EXPECT_EQ(resolvingSymbolicLinksInPath(String::fromUTF8("/no-such-item/../..")).utf8(), "/");
+    EXPECT_EQ(resolvingSymbolicLinksInPath(String::fromUTF8("a/../b")).utf8(), "a/../b");
+    EXPECT_TRUE(resolvingSymbolicLinksInPath(nullptr).isNull());
+
+    const URLRef inner = resolvingSymbolicLinks(*urlOf(folder / "link/inner"));
+    EXPECT_EQ(pathOf(inner), folder / "real/inner");
+    EXPECT_TRUE(inner->hasDirectoryPath());
+    EXPECT_EQ(resolvingSymbolicLinks(*urlOf(folder / "dangling")), nullptr);
+    EXPECT_EQ(pathOf(filePathURL(urlOf(folder / "dangling"))), folder / "dangling");
+    EXPECT_EQ(filePathURL(urlOf(folder / "missing")), nullptr);
+    EXPECT_EQ(filePathURL(nullptr), nullptr);
+}
+
+TEST(VolumeIdentifier, IsSharedByTheItemsOfAVolume)
+{
+    const TemporaryFolder folder;
+    const auto ofFolder = volumeIdentifier(*urlOf(folder.path(), true));
+    const auto ofFile = volumeIdentifier(*urlOf(folder.write("a", "")));
+    const auto ofOther = volumeIdentifier(*urlOf("/proc/self/status"));
+    ASSERT_TRUE(ofFolder && ofFile && ofOther);
+    EXPECT_EQ(*ofFolder, *ofFile);
+    EXPECT_NE(*ofFolder, *ofOther);
+    EXPECT_EQ(volumeIdentifier(*urlOf(folder / "missing")), nullptr);
+}
+
+TEST(FilePackage, IsAFolderWithAPackageExtension)
+{
+    const TemporaryFolder folder;
+    for (const char* name : {"Song.fuguex", "Old.BAND", "plain", ".fuguex", "Song.txt"})
+        fs::create_directory(folder / name);
+    folder.write("file.fuguex", "");
+    const auto isPackage = [&](const char* name) { return isFilePackage(String::fromUTF8(folder / name)); };
+    EXPECT_TRUE(isPackage("Song.fuguex") && isPackage("Old.BAND"));
+    EXPECT_FALSE(isPackage("plain") || isPackage(".fuguex") || isPackage("Song.txt"));
+    EXPECT_FALSE(isPackage("file.fuguex") || isPackage("missing.fuguex") || isFilePackage(nullptr));
+}
+
+TEST(DisplayName, ComesFromDesktopEntriesInTheUsersLanguage)
+{
+    const TemporaryFolder folder;
+    fs::create_directory(folder / "music");
+    const std::string entry = folder.write("music/.directory", "# a comment\n[Other]\nName=Wrong\n[Desktop Entry]\n"
+                                                               "Name = My\\sMusic\r\nName[de]=Meine Musik\n"
+                                                               "Name[de_AT]=Mei Musi\nName[sr@latin]=Muzika\n");
+    struct Case {
+        const char* locale;
+        const char* expected;
+    };
+    for (const Case c : {Case{"C", "My Music"},
+                         {"de_DE.UTF-8", "Meine Musik"},
+                         {"de_AT", "Mei Musi"},
+                         {"sr_RS.UTF-8@latin", "Muzika"},
+                         {"fr_FR", "My Music"}}) {
+        ::setenv("LC_ALL", c.locale, 1);
+        EXPECT_EQ(displayName(*urlOf(folder / "music", true)).utf8(), c.expected) << c.locale;
+    }
+    ::unsetenv("LC_ALL");
+    EXPECT_EQ(displayName(*urlOf(folder.write("x.wav", ""))).utf8(), "x.wav");
+    EXPECT_TRUE(displayName(*urlOf(folder / "missing")).isNull());
+
+    // What is no entry, or far too long for one, leaves the folder its own name.
+    for (const std::string& content : {std::string("[Desktop Entry"), std::string("Name=x"), std::string(100000, 'x'),
+                                       std::string("[Desktop Entry]\nName=\xFF")}) {
+        folder.write("music/.directory", content);
+        EXPECT_EQ(displayName(*urlOf(folder / "music", true)).utf8(), "music");
+    }
+}

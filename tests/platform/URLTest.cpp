@@ -1,0 +1,299 @@
+#include "platform/URL.h"
+
+#include <gtest/gtest.h>
+
+using namespace platform;
+using namespace std::string_literals;
+
+namespace {
+
+URLRef fromPath(const std::string& path, bool isDirectory = false, const URLRef& base = nullptr)
+{
+    return URL::createWithFileSystemPath(String::fromUTF8(path), PathStyle::posix, isDirectory, base);
+}
+
+/// The path of a URL in a style, "(null)" for none.
+std::string pathOf(const URLRef& url, PathStyle style = PathStyle::posix)
+{
+    const String path = url ? url->copyFileSystemPath(style) : nullptr;
+    return path.isNull() ? "(null)" : path.utf8();
+}
+
+std::string textOf(const URLRef& url)
+{
+    return url ? url->string() : "(null)";
+}
+
+} // namespace
+
+TEST(URL, PathsBecomeTextAndComeBack)
+{
+    struct Case {
+        std::string path;
+        bool isDirectory;
+        std::string kept; // as copyFileSystemPath gives it
+        std::string text;
+    };
+    const Case cases[] = {
+        {"/", false, "/", "file:///"}, // the root is always a directory
+        {"///", true, "/", "file:///"},
+        {"/a/b", false, "/a/b", "file:///a/b"},
+        {"/a/b/", false, "/a/b", "file:///a/b"},
+        {"/a/b", true, "/a/b", "file:///a/b/"},
+        {"//a//b/", true, "/a/b", "file:///a/b/"},
+        {"/a/./../b", false, "/a/./../b", "file:///a/./../b"},
+        {"/~/x", false, "/~/x", "file:///~/x"},
+        {"/100% ?#;[x]:\n", false, "/100% ?#;[x]:\n", "file:///100%25%20%3F%23%3B%5Bx%5D%3A%0A"},
+        {"/%2F%41", false, "/%2F%41", "file:///%252F%2541"}, // a path has no escapes
+        {"/\u00DCber/\U0001F3B5", false, "/\u00DCber/\U0001F3B5", "file:///%C3%9Cber/%F0%9F%8E%B5"},
+        {"a\\b", false, "a\\b", "a%5Cb"},
+        {"a:b/c", false, "a:b/c", "a%3Ab/c"}, // no scheme
+        {".", false, ".", "./"},              // and so are dots
+        {"/a/..", false, "/a/..", "file:///a/../"},
+        {"/" + std::string(5000, 'x'), false, "/" + std::string(5000, 'x'), "file:///" + std::string(5000, 'x')},
+    };
+    for (const Case& c : cases) {
+        const URLRef url = fromPath(c.path, c.isDirectory);
+        ASSERT_NE(url, nullptr) << c.path;
+        EXPECT_EQ(pathOf(url), c.kept);
+        EXPECT_EQ(url->posixPath(), c.kept);
+        EXPECT_EQ(url->string(), c.text);
+        EXPECT_EQ(url->hasDirectoryPath(), c.text.ends_with('/')) << c.path;
+        EXPECT_EQ(url->hasAbsolutePath(), c.path[0] == '/');
+        EXPECT_EQ(url->isFileURL(), c.path[0] == '/');
+        const URLRef again = URL::createWithString(c.text);
+        ASSERT_NE(again, nullptr) << c.text;
+        EXPECT_EQ(*again, *url) << c.text;
+        EXPECT_EQ(again->hash(), url->hash());
+    }
+    EXPECT_NE(*fromPath("/a"), *fromPath("/a", true));
+    EXPECT_EQ(fromPath("", true), nullptr);
+    EXPECT_EQ(fromPath("/a\0b"s), nullptr);
+    EXPECT_EQ(URL::createWithFileSystemPath(nullptr, PathStyle::posix, false), nullptr);
+    EXPECT_EQ(URL::createWithFileSystemPath(String::fromFileSystemRepresentation("/\xFF"), PathStyle::posix, false),
+              nullptr);
+}
+
+TEST(URL, TextIsReadStrictlyAndKeptInOneForm)
+{
+    struct Case {
+        std::string text;
+        std::string path;
+        std::string canonical;
+    };
+    const Case cases[] = {
+        {"FILE:///x", "/x", "file:///x"},
+        {"file:/x", "/x", "file:///x"},
+        {"file://localhost/x", "/x", "file:///x"},
+        {"file://LocalHost/x/", "/x", "file:///x/"},
+        {"file:////a//b", "/a/b", "file:///a/b"},
+        {"file:///%c3%A4%41;v=1", "/\u00E4A;v=1", "file:///%C3%A4A%3Bv%3D1"},
+        {"file:///\u00E4", "/\u00E4", "file:///%C3%A4"},
+        {"file:///a/b?query#frag", "/a/b", "file:///a/b?query#frag"},
+        {"file:///a/?q", "/a", "file:///a/?q"},
+        {"file:///a/..", "/a/..", "file:///a/../"}, // dots name a folder
+        {"file:///.", "/.", "file:///./"},
+        {"/a%20b", "/a b", "file:///a%20b"},
+        {"a/b", "a/b", "a/b"},
+        {"http://host/a%2Fb/?x", "(null)", "http://host/a%2Fb/?x"},
+        {"http://host/\u00E4", "(null)", "http://host/%C3%A4"},
+        {"mailto:a", "(null)", "mailto:a"},
+        {"file://Server/share/x", "(null)", "file://server/share/x"}, // another host's file has no path here
+    };
+    for (const Case& c : cases) {
+        const URLRef url = URL::createWithString(c.text);
+        ASSERT_NE(url, nullptr) << c.text;
+        EXPECT_EQ(pathOf(url), c.path) << c.text;
+        EXPECT_EQ(url->posixPath(), c.path == "(null)" ? "" : c.path);
+        EXPECT_EQ(url->string(), c.canonical);
+        EXPECT_EQ(url->absoluteString(), c.canonical);
+        EXPECT_EQ(*URL::createWithString(c.canonical), *url);
+    }
+    const std::string refused[] = {
+        "",
+        "#f",
+        "file:",
+        "file://",
+        "file:x",
+        "file:///a b",
+        "file:///a\\b",
+        "file:///%",
+        "file:///%4",
+        "file:///%zz",
+        "file:///a%2Fb",
+        "file:///a%2f",
+        "file:///a%00b",
+        "file:///%FF",
+        "file:///\xFF",
+        "file:///a\0"s,
+        "file:///[",
+        "%2F",
+        "file://h:1/x",
+        "file://u@h/x",
+        "file://[::1]/x",
+        "file://h%41/x",
+        "//host/x",
+        "C:\\a",
+    };
+    for (const std::string& text : refused)
+        EXPECT_EQ(URL::createWithString(text), nullptr) << text;
+}
+
+TEST(URL, BasesAreApplied)
+{
+    struct Case {
+        std::string relative;
+        std::string path;
+        std::string text;
+    };
+    const URLRef base = fromPath("/music/set list", true);
+    const Case cases[] = {
+        {"a/b", "/music/set list/a/b", "a/b"},
+        {"../x%20/", "/music/x ", "../x%20/"},
+        {"../../../x", "/x", "../../../x"},
+        {"..", "/music", "../"},
+        {".", "/music/set list", "./"},
+        {"x?q", "/music/set list/x", "x?q"},
+        {"/x", "/x", "file:///x"},
+        {"../..", "/", "../../"},
+        {"file:///y", "/y", "file:///y"},
+        {"//localhost/z", "/z", "file:///z"},
+        {"//server/z", "(null)", "file://server/z"},
+    };
+    for (const Case& c : cases) {
+        const URLRef url = URL::createWithString(c.relative, base);
+        ASSERT_NE(url, nullptr) << c.relative;
+        EXPECT_EQ(pathOf(url), c.path) << c.relative;
+        EXPECT_EQ(url->string(), c.text);
+        EXPECT_EQ(url->baseURL(), url->hasAbsolutePath() ? nullptr : base) << c.relative;
+        EXPECT_TRUE(url->isFileURL());
+        EXPECT_EQ(textOf(URL::createWithString(url->absoluteString())), url->absoluteString());
+        if (url->baseURL()) {
+            EXPECT_EQ(*URL::createWithString(url->string(), fromPath("/music/set list", true)), *url);
+            EXPECT_NE(*URL::createWithString(url->string(), fromPath("/music/set list/x", true)), *url);
+            EXPECT_NE(*URL::createWithString(url->absoluteString()), *url);
+        }
+    }
+    EXPECT_EQ(pathOf(fromPath("x", false, fromPath("/music/file"))), "/music/x"); // beside a file
+    EXPECT_EQ(pathOf(fromPath("x", false, fromPath("b/", true))), "b/x");
+    EXPECT_EQ(pathOf(fromPath("../x", false, fromPath("c", true, base))), "/music/set list/x");
+    EXPECT_EQ(fromPath("x", false, base)->absoluteString(), "file:///music/set%20list/x");
+    EXPECT_EQ(fromPath("/x", false, base)->baseURL(), nullptr);
+    const URLRef remote = URL::createWithString("x", URL::createWithString("file://server/share/"));
+    EXPECT_EQ(remote->absoluteString(), "file://server/share/x");
+    EXPECT_EQ(fromPath("y", false, remote)->absoluteString(), "file://server/share/y");
+    EXPECT_EQ(URL::createWithString("/x", URL::createWithString("file://server/share/"))->string(), "file://server/x");
+    EXPECT_EQ(URL::createWithString("x", URL::createWithString("http://host/")), nullptr);
+}
+
+TEST(URL, PathStylesOfOtherSystems)
+{
+    struct Case {
+        PathStyle style;
+        std::string text;
+        std::string posix; // "(none)": no URL; "(null)": a URL without a POSIX path
+        std::string again; // the path in the style
+    };
+    const PathStyle windows = PathStyle::windows, colon = PathStyle::colon;
+    const Case cases[] = {
+        {windows, "C:\\a b\\c%", "/C:/a b/c%", "C:\\a b\\c%"},
+        {windows, "c:/a\\", "/c:/a", "c:\\a"},
+        {windows, "C:", "/C:", "C:\\"},
+        {windows, "C:\\", "/C:", "C:\\"},
+        {windows, "C:a", "(none)", ""}, // in a drive's current folder
+        {windows, "\\a\\\\b", "/a/b", "\\a\\b"},
+        {windows, "\\", "/", "\\"},
+        {windows, "a\\..\\b", "a/../b", "a\\..\\b"},
+        {windows, "\\\\Server\\share\\x", "(null)", "\\\\server\\share\\x"},
+        {windows, "\\\\server", "(null)", "\\\\server\\"},
+        {windows, "\\\\localhost\\share", "/share", "\\share"},
+        {windows, "\\\\?\\C:\\a", "(none)", ""},
+        {windows, "\\\\", "(none)", ""},
+        {colon, "Disk:Folder:File", "/Volumes/Disk/Folder/File", "Disk:Folder:File"},
+        {colon, "Disk:Folder:File:", "/Volumes/Disk/Folder/File", "Disk:Folder:File"},
+        {colon, "Disk", "/Volumes/Disk", "Disk:"},
+        {colon, "Disk:", "/Volumes/Disk", "Disk:"},
+        {colon, "Disk:a::b", "/Volumes/Disk/a/../b", "Disk:a::b"},
+        {colon, "Disk:a::", "/Volumes/Disk/a/..", "Disk:a::"},
+        {colon, "Disk::", "(none)", ""}, // out of its volume
+        {colon, "Disk::x:y", "(none)", ""},
+        {colon, "Disk:4/4 Beats", "/Volumes/Disk/4:4 Beats", "Disk:4/4 Beats"},
+        {colon, "Disk:a:..", "(none)", ""}, // names there, but not in POSIX
+        {colon, ".:x", "(none)", ""},
+        {colon, ":rel:x", "rel/x", ":rel:x"},
+        {colon, ":", ".", ":"},
+        {colon, "::", "..", "::"},
+        {colon, "::up", "../up", "::up"},
+        {colon, ":::up:", "../../up", ":::up"},
+        {colon, ":a::", "a/..", ":a::"},
+    };
+    for (const Case& c : cases) {
+        const URLRef url = URL::createWithFileSystemPath(String::fromUTF8(c.text), c.style, false);
+        ASSERT_EQ(url == nullptr, c.posix == "(none)") << c.text;
+        if (url) {
+            EXPECT_EQ(pathOf(url), c.posix) << c.text;
+            EXPECT_EQ(pathOf(url, c.style), c.again) << c.text;
+        }
+    }
+    // What a style would read back as something else it does not get.
+    for (const char* path : {"/a\\b", "C:/a", "a\\b"})
+        EXPECT_EQ(pathOf(fromPath(path), windows), "(null)") << path;
+    for (const char* path : {"/", "/a", "/Volumes", "/Volumes/.", "/Volumes/..", "/Volumes/a/../b"})
+        EXPECT_EQ(pathOf(fromPath(path), colon), "(null)") << path;
+    EXPECT_EQ(pathOf(fromPath("/a:b/C:"), windows), "\\a:b\\C:");
+    EXPECT_EQ(pathOf(fromPath("/Volumes/D/a:b/./c"), colon), "D:a/b:c");
+    EXPECT_EQ(pathOf(URL::createWithString("file://server/Volumes/x/y"), colon), "(null)");
+}
+
+TEST(URL, ComponentsAreTakenOffAndPutOn)
+{
+    struct Case {
+        std::string text;
+        std::string last;
+        std::string extension; // "-": none
+        std::string parent;
+        std::string child; // with "x y.z" put on
+    };
+    const Case cases[] = {
+        {"file:///", "/", "-", "file:///", "file:///x%20y.z"},
+        {"file:///a", "a", "-", "file:///", "file:///a/x%20y.z"},
+        {"file:///a/b.c.d/", "b.c.d", "d", "file:///a/", "file:///a/b.c.d/x%20y.z"},
+        {"file:///a/b?q#f", "b", "-", "file:///a/", "file:///a/b/x%20y.z"},
+        {"file:///a/..", "..", "-", "file:///a/../../", "file:///a/../x%20y.z"},
+        {"file:///a/.", ".", "-", "file:///a/../", "file:///a/./x%20y.z"},
+        {"file:///%C3%A4.%C3%A4", "\u00E4.\u00E4", "\u00E4", "file:///", "file:///%C3%A4.%C3%A4/x%20y.z"},
+        {"file:///.hidden", ".hidden", "-", "file:///", "file:///.hidden/x%20y.z"},
+        {"file:///dot.", "dot.", "-", "file:///", "file:///dot./x%20y.z"},
+        {"file:///No.%201", "No. 1", "-", "file:///", "file:///No.%201/x%20y.z"},
+        {"file://server/a", "a", "-", "file://server/", "file://server/a/x%20y.z"},
+        {"a.b", "a.b", "b", "./", "a.b/x%20y.z"},
+        {"./", ".", "-", "../", "x%20y.z"},
+        {"../", "..", "-", "../../", "../x%20y.z"},
+        {"http://host/a.b", "(null)", "-", "(null)", "(null)"},
+    };
+    const String name = String::fromUTF8("x y.z");
+    for (const Case& c : cases) {
+        const URLRef url = URL::createWithString(c.text);
+        ASSERT_NE(url, nullptr) << c.text;
+        EXPECT_EQ(url->copyLastPathComponent(), c.last == "(null)" ? String() : String::fromUTF8(c.last)) << c.text;
+        EXPECT_EQ(url->copyPathExtension(), c.extension == "-" ? String() : String::fromUTF8(c.extension)) << c.text;
+        EXPECT_EQ(textOf(url->deletingLastPathComponent()), c.parent) << c.text;
+        EXPECT_EQ(textOf(url->appendingPathComponent(name, false)), c.child) << c.text;
+    }
+    const URLRef url = fromPath("/a");
+    EXPECT_EQ(textOf(url->appendingPathComponent(String::fromUTF8("/b//c/"), true)), "file:///a/b/c/");
+    for (const String& none : {String(), String::fromUTF8(""), String::fromUTF8("/"), String::fromUTF8("b\0"s)})
+        EXPECT_EQ(url->appendingPathComponent(none, true), nullptr);
+    const URLRef relative = fromPath("b/c", false, fromPath("/a", true));
+    EXPECT_EQ(textOf(relative->deletingLastPathComponent()), "b/");
+    EXPECT_EQ(pathOf(relative->deletingLastPathComponent()->deletingLastPathComponent()), "/a");
+    EXPECT_EQ(pathOf(relative->appendingPathComponent(name, false)), "/a/b/c/x y.z");
+}
+
+TEST(URL, FileReferencesAreKnown)
+{
+    for (const char* text : {"file:///.file/id=6571367.2773272/", "file://localhost/.file/id=1"})
+        EXPECT_TRUE(URL::createWithString(text)->isFileReferenceURL()) << text;
+    for (const char* text : {"file:///.file/x", "file:///a/.file/id=1", "file://server/.file/id=1", "http:/.file/id=1"})
+        EXPECT_FALSE(URL::createWithString(text)->isFileReferenceURL()) << text;
+}

@@ -15,8 +15,12 @@ enum : unsigned int {
     kFileIOMemory = 0x8000,      // a memory file: the cache block is its content
 };
 
-/// The base names the open file, its links resolved. Operations return status codes (platform/core/Status.h). Owns its
-/// descriptor and its write cache, shares its read cache; one thread at a time.
+/// The base names the open file, its links resolved. Operations return status codes (platform/core/Status.h); a system
+/// error comes back as PosixErrorToOSErr maps it. Owns its descriptor and its write cache, shares its read cache; one
+/// thread at a time.
+///
+/// Bytes in the write cache belong at the mark and are not in the file: call FlushWCache before moving the mark or
+/// reading what was written.
 class KT_EXPORT CFileIO : public CFileRef {
 public:
     CFileIO() = default;
@@ -26,15 +30,21 @@ public:
     CFileIO& operator=(const CFileIO&) = delete;
     virtual ~CFileIO();
 
-    /// The state of a new object: caches dropped, nothing flushed.
+    /// The state of a new object: closed, caches dropped, nothing flushed.
     void Init();
+    /// Opens what `ref` names, an alias file or symbolic link resolved. kStatusFileNotFound for a missing file without
+    /// kFileIOReadWrite (with it, the file is created with permissions 0644), kStatusParameterError for a folder,
+    /// kStatusNotAFile for a FIFO, socket or device. A memory file ignores `ref` and takes the cache block for its
+    /// content. A failed open leaves the object closed.
     std::int32_t Open(const CFileRef& ref, unsigned int mode);
     std::int32_t OpenRead(const CFileRef& ref, unsigned int mode) { return Open(ref, mode & ~kFileIOReadWrite); }
     std::int32_t OpenReadWrite(const CFileRef& ref, unsigned int mode) { return Open(ref, mode | kFileIOReadWrite); }
-    /// Flushes and frees the write cache, closes, resets the base. The cache block is kept.
+    /// Flushes and frees the write cache, closes, resets the base. The cache block is kept. The object is closed
+    /// whatever is returned: the failure to flush, else that to close.
     std::int32_t Close();
 
     /// At a position, through the read cache; `actual` (may be null) receives the bytes delivered, also on failure.
+    /// kStatusEndOfFile when the file ends before `count` bytes.
     std::int32_t Read(void* buffer, long long position, long count, long* actual);
     /// At the mark, which advances on success.
     std::int32_t Read(void* buffer, long count);
@@ -45,19 +55,27 @@ public:
     /// Moves the mark back; kStatusBeforeStart, and the mark at 0, when that would go below 0.
     std::int32_t UnRead(long count);
 
-    /// At a position: flushes the write cache, empties the read cache, leaves the mark.
+    /// At a position: flushes the write cache first, empties the read cache. kStatusDiskFull when nothing more could be
+    /// written.
     std::int32_t Write(const void* buffer, long long position, long count);
-    /// At the mark, through the write cache.
+    /// At the mark: into the write cache when it has room, else straight to the file, and the mark advances.
     std::int32_t Write(const void* buffer, long count);
+    /// Writes the pending bytes at the mark, which advances; they stay pending when that fails.
     std::int32_t FlushWCache();
     /// Commits the file to storage; what lies in the write cache is not part of that.
     std::int32_t Flush();
 
+    /// The length in bytes, asked of the system each time; 0 on error. Bytes in the write cache do not count.
     long long GetEOF() const;
     std::int32_t GetEOF(long long* length) const;
+    /// The length that Open met, which costs nothing; a file that others write may have another by now.
+    long long LengthAtOpen() const { return mLengthAtOpen; }
+    /// Cuts the file or extends it with zeros; a mark beyond `length` moves there.
     std::int32_t SetEOF(long long length);
+    /// SetEOF, with `preallocate` after asking for `length` bytes of space behind the end of the file, which may fail.
     std::int32_t Allocate(long long length, bool preallocate);
-    /// Moves everything from `from` to the end of the file so that it begins at `to`.
+    /// Moves everything from `from` (at most the length) to the end of the file so that it begins at `to`; the length
+    /// changes by the distance. kStatusNotOpen without write access.
     std::int32_t BlockMove(long long from, long long to);
     /// The CRC-32 from the mark on, over as many bytes as the file is long; 0xFFFFFFFF when they are not there.
     std::uint32_t CRC();
@@ -65,10 +83,14 @@ public:
     long long GetMark() const { return mMark; }
     void SetMark(long long mark) { mMark = mark; }
 
+    /// The read cache, empty and of `size` bytes; in memory mode the content: `size` zeros.
     std::int32_t SetCache(long size);
+    /// The same with the caller's block, which stays shared; in memory mode it is the content.
     std::int32_t SetCache(const std::shared_ptr<KTMem>& block);
     void ResetCache();
+    /// Flushes first; when that fails its status is returned and nothing changes. 0 for no write cache.
     std::int32_t SetWCache(int size);
+    /// The same with an array from `new char[]`, owned from then on, unless an error is returned.
     std::int32_t SetWCache(char* buffer, long size);
     /// Pending bytes are lost.
     void DeAllocWCache();
@@ -80,9 +102,24 @@ public:
     const std::shared_ptr<KTMem>& CacheBlock() const { return mCache; }
 
 private:
-    std::int32_t OpenPath(unsigned int mode);
-    std::int32_t ReadDirect(void* buffer, long long position, long count, long* actual);
-    std::int32_t WriteDirect(const void* buffer, long long position, long count, long long* written);
+    std::int32_t OpenFile(const CFileRef& ref, unsigned int mode);
+    std::int32_t OpenStepByStep(const CFileRef& ref, unsigned int mode);
+    void Adopt(int descriptor, long long length, unsigned int mode);
+    std::int32_t CloseDescriptor();
+    void ForgetPosition();
+
+    long CopyFromCache(void* buffer, long long position, long count) const;
+    bool Refill(long long position, long needed);
+    std::int32_t ReadDirect(void* buffer, long long position, long count, long enough, long* actual) const;
+    std::int32_t WriteThrough(const void* buffer, long long position, long count);
+    std::int32_t WriteToMemory(const void* buffer, long long position, long count);
+    std::int32_t ResizeMemory(long long length);
+    std::int32_t MoveUp(long long from, long long distance, long long length);
+    std::int32_t MoveDown(long long from, long long distance, long long length);
+    std::int32_t ReserveBehind(long long end, long long size);
+    std::int32_t ReadPiece(void* buffer, long long position, long count);
+    void AdoptWriteCache(std::unique_ptr<char[]> buffer, long long size);
+    long long Pending() const { return mWriteCacheFill - mWriteCache.get(); }
 
     std::int32_t mDescriptor = -1;
     long long mCacheOffset = 0;
@@ -93,4 +130,5 @@ private:
     char* mWriteCacheFill = nullptr;
     long long mWriteCacheCapacity = 0;
     unsigned int mMode = 0;
+    long long mLengthAtOpen = 0;
 };

@@ -1,5 +1,5 @@
 // CFileRef names a file or folder: the value type by which everything else in the library is told where. It owns a
-// share of one immutable file URL and caches what is costly to compute from it. It never opens the file.
+// share of one immutable file URL, which holds the path, and caches the item's handle. It never opens the file.
 #pragma once
 
 #include "platform/Bookmark.h"
@@ -32,24 +32,29 @@ struct UnicodeName {
     char16_t unicode[255] = {};
 };
 
-/// Every setter first resets the reference, so that a failed one leaves it invalid and never with its old value.
-/// Booleans report success. Texts taken as `const char*` are UTF-8. One reference is used by one thread at a time;
-/// copies may go to other threads.
+/// Every setter, and every operation that builds on the path, first resets the reference, so that a failed one leaves
+/// it invalid and never with its old value. Booleans report success. Texts taken as `const char*` are UTF-8. A
+/// reference may be read by several threads while none changes it; copies are independent.
 class KT_EXPORT CFileRef {
 public:
-    static const CFileRef None;                     // the answer of queries that have none
-    static platform::TextEncoding mLocalEncoding;   // tried first by SetFromColonPath; set once, at start-up
+    static const CFileRef None;                   // the answer of queries that have none
+    static platform::TextEncoding mLocalEncoding; // tried first by SetFromColonPath; set once, at start-up
 
     CFileRef() = default;
     CFileRef(const char* path, bool isDirectory);
     CFileRef(const platform::String& path, tPathStyle style, bool isDirectory);
     CFileRef(const platform::String& folder, const platform::String& name);
     explicit CFileRef(platform::URLRef url);
+    /// A folder and a name are platform strings: a second pointer would pass for `isDirectory`.
+    template <class T>
+    CFileRef(const char* folder, const T* name) = delete;
+    /// Copies share the URL; the handle stays behind.
     CFileRef(const CFileRef& other);
     CFileRef& operator=(const CFileRef& other);
     ~CFileRef();
 
-    void Init();
+    /// The state of a new object.
+    void Init() { ReInit(); }
     void ReInit();
     void Invalidate() { ReInit(); }
 
@@ -59,10 +64,15 @@ public:
     bool Set(const platform::String& path, tPathStyle style, bool isDirectory);
     /// `name` in `folder`, a file; without a name the folder itself.
     bool Set(const platform::String& folder, const platform::String& name);
+    template <class T>
+    bool Set(const char* folder, const T* name) = delete;
+    /// The URL as it is.
     bool Set(platform::URLRef url);
+    /// The path of the URL, as a directory or not.
     bool Set(const platform::URLRef& url, bool isDirectory);
     bool Set(const CFileRef& other, bool isDirectory);
     bool Set(const platform::FileHandle* handle);
+    /// "Volume:folder:file", in `mLocalEncoding`, else in the system's encoding, else in 16-bit Unicode.
     bool SetFromColonPath(const char* path, bool isDirectory);
     bool SetFromURLString(const std::string& url);
     /// From what CreatePList made.
@@ -82,7 +92,8 @@ public:
     bool IsValid() const { return mValid; }
     const platform::URLRef& URL() const { return mURL; }
 
-    /// The path without trailing slashes, owned by the reference until its next change; null when there is none.
+    /// The path without trailing slashes, owned by the URL: valid until the reference changes. Null when there is none:
+    /// for a relative URL, and one of another host or scheme.
     const char* GetPath() const;
     /// True only when the whole path fitted; `buffer` is made empty first.
     bool GetPath(char* buffer, unsigned int size) const;
@@ -126,17 +137,22 @@ public:
     std::optional<platform::Dictionary> CreatePList(tCFileRefPListCreationType type) const;
     std::optional<Bytes> CreateBinaryPList(tCFileRefPListCreationType type) const;
 
-    /// By the path with symbolic links resolved; invalid references are equal, and come last.
+    /// By the path with symbolic links resolved; invalid references are equal, and come last. All six are there
+    /// because a missing one would compare the pointers that `operator const char*` gives.
     friend KT_EXPORT bool operator==(const CFileRef& a, const CFileRef& b);
     friend KT_EXPORT bool operator<(const CFileRef& a, const CFileRef& b);
+    friend bool operator>(const CFileRef& a, const CFileRef& b) { return b < a; }
+    friend bool operator<=(const CFileRef& a, const CFileRef& b) { return !(b < a); }
+    friend bool operator>=(const CFileRef& a, const CFileRef& b) { return !(a < b); }
     std::size_t hash() const;
 
     /// Writes the path and whether it exists to standard output.
     void Trace() const;
 
 private:
+    bool SetTildePath(const platform::String& path, bool isDirectory);
+
     platform::URLRef mURL;
     bool mValid = false;
-    mutable std::unique_ptr<char[]> mPath;              // cache of GetPath
-    std::unique_ptr<platform::FileHandle> mFileHandle;  // cache of UpdateInternalFSRef; null is all zero
+    std::unique_ptr<platform::FileHandle> mFileHandle; // cache of UpdateInternalFSRef; null is all zero
 };

@@ -3,6 +3,12 @@
 
 #include "platform/SystemCalls.h"
 
+#include <algorithm>
+#include <array>
+#include <cerrno>
+#include <cstdint>
+#include <limits>
+
 /// Restores the call table when it goes out of scope: assign to `platform::systemCalls()` freely meanwhile.
 class SystemCallGuard {
 public:
@@ -14,4 +20,86 @@ public:
 
 private:
     platform::SystemCalls saved_;
+};
+
+enum class Call {
+    openFile,
+    openFileWithoutLinks,
+    createFile,
+    close,
+    pread,
+    pwrite,
+    ftruncate,
+    fsync,
+    preallocate,
+    count
+};
+
+/// Counts the calls of the table and makes some of them fail, until it goes out of scope. One at a time.
+class FaultInjector {
+public:
+    FaultInjector()
+    {
+        using platform::SystemCalls;
+        current_ = this;
+        SystemCalls& calls = platform::systemCalls();
+        calls.openFile = intercept<Call::openFile, &SystemCalls::openFile>;
+        calls.openFileWithoutLinks = intercept<Call::openFileWithoutLinks, &SystemCalls::openFileWithoutLinks>;
+        calls.createFile = intercept<Call::createFile, &SystemCalls::createFile>;
+        calls.ftruncate = intercept<Call::ftruncate, &SystemCalls::ftruncate>;
+        calls.fsync = intercept<Call::fsync, &SystemCalls::fsync>;
+        calls.preallocate = intercept<Call::preallocate, &SystemCalls::preallocate>;
+        calls.pread = transfer<Call::pread, &SystemCalls::pread>;
+        calls.pwrite = transfer<Call::pwrite, &SystemCalls::pwrite>;
+        // Like the system's, a close that fails has closed.
+        calls.close = [](int descriptor) {
+            const int result = real().close(descriptor);
+            return hit(Call::close) ? failed() : result;
+        };
+    }
+    ~FaultInjector() { current_ = nullptr; }
+
+    /// The `nth` call from now on (1 is the next), and the `times - 1` after it, fail with `error`; an error of 0 makes
+    /// a transfer return 0. A call has one such plan at a time.
+    void fail(Call call, int error, int nth = 1, int times = 1)
+    {
+        Plan& plan = of(call);
+        plan = {plan.calls + nth, plan.calls + nth + times, error, plan.calls};
+    }
+    /// Every transfer moves at most `bytes` bytes.
+    void limitTransfers(std::size_t bytes) { limit_ = bytes; }
+    /// Calls made since construction, failed ones included.
+    int calls(Call call) { return of(call).calls; }
+
+private:
+    struct Plan {
+        int first = 0, end = 0, error = 0, calls = 0;
+    };
+    Plan& of(Call call) { return plans_[static_cast<std::size_t>(call)]; }
+    static const platform::SystemCalls& real() { return current_->guard_.real(); }
+    static int failed() { return errno == 0 ? 0 : -1; }
+    static bool hit(Call call)
+    {
+        Plan& plan = current_->of(call);
+        ++plan.calls;
+        if (plan.calls < plan.first || plan.calls >= plan.end)
+            return false;
+        errno = plan.error;
+        return true;
+    }
+    template <Call call, auto entry, class... Arguments>
+    static int intercept(Arguments... arguments)
+    {
+        return hit(call) ? failed() : (real().*entry)(arguments...);
+    }
+    template <Call call, auto entry, class Buffer>
+    static std::int64_t transfer(int descriptor, Buffer buffer, std::size_t count, std::int64_t offset)
+    {
+        return hit(call) ? failed() : (real().*entry)(descriptor, buffer, std::min(count, current_->limit_), offset);
+    }
+
+    inline static FaultInjector* current_ = nullptr;
+    SystemCallGuard guard_;
+    std::array<Plan, static_cast<std::size_t>(Call::count)> plans_;
+    std::size_t limit_ = std::numeric_limits<std::size_t>::max();
 };

@@ -1,0 +1,252 @@
+// How CFileIO reads, writes and changes its length.
+#include "files/CFileIO.h"
+
+#include "platform/Log.h"
+#include "platform/SystemCalls.h"
+
+#include <algorithm>
+#include <cerrno>
+#include <cstdlib>
+#include <cstring>
+#include <limits>
+#include <system_error>
+
+namespace {
+
+constexpr long kLargestPiece = std::numeric_limits<std::int32_t>::max(); // bytes per system call
+
+} // namespace
+
+std::int32_t CFileIO::Read(void* buffer, long long position, long count, long* actual)
+{
+    long ignored = 0;
+    long& delivered = actual != nullptr ? *actual : ignored;
+    delivered = 0;
+    if (count == 0)
+        return kStatusOK;
+    if (buffer == nullptr || count < 0)
+        return kStatusParameterError;
+    if (!mCache || position < 0)
+        return ReadDirect(buffer, position, count, count, &delivered);
+
+    delivered = CopyFromCache(buffer, position, count);
+    if (delivered == count)
+        return kStatusOK;
+    if (IsMemoryFile())
+        return kStatusEndOfFile;
+
+    std::byte* to = static_cast<std::byte*>(buffer) + delivered;
+    const long rest = count - delivered;
+    position += delivered;
+    if (Refill(position, rest)) {
+        delivered += CopyFromCache(to, position, rest);
+        return kStatusOK;
+    }
+    long direct = 0;
+    const std::int32_t status = ReadDirect(to, position, rest, rest, &direct);
+    delivered += direct;
+    return status;
+}
+
+/// Reads until `enough` of `count` bytes are there; reading on to the end of a file that is known to be near would cost
+/// a call that delivers nothing.
+std::int32_t CFileIO::ReadDirect(void* buffer, long long position, long count, long enough, long* actual) const
+{
+    *actual = 0;
+    while (*actual < enough) {
+        const long piece = std::min(count - *actual, kLargestPiece);
+        const std::int64_t got = platform::systemCalls().pread(mDescriptor, static_cast<std::byte*>(buffer) + *actual,
+                                                               static_cast<std::size_t>(piece), position + *actual);
+        if (got < 0) {
+            const int error = errno;
+            if (error == EINTR)
+                continue;
+            platform::logLine("Encountered read failure " + std::to_string(error) + " " +
+                              std::generic_category().message(error));
+            return PosixErrorToOSErr(error);
+        }
+        if (got == 0)
+            return kStatusEndOfFile;
+        *actual += static_cast<long>(got);
+    }
+    return kStatusOK;
+}
+
+std::int32_t CFileIO::Read(void* buffer, long count)
+{
+    const std::int32_t status = Read(buffer, mMark, count, nullptr);
+    if (status == kStatusOK)
+        mMark += count;
+    return status;
+}
+
+std::int32_t CFileIO::Read(void* buffer, long* count)
+{
+    if (count == nullptr)
+        return kStatusParameterError;
+    const std::int32_t status = Read(buffer, mMark, *count, count);
+    mMark += *count;
+    return status;
+}
+
+std::int32_t CFileIO::Read(void** data, long* size)
+{
+    if (data == nullptr || size == nullptr)
+        return kStatusParameterError;
+    *data = nullptr;
+    *size = 0;
+    long long length = 0;
+    std::int32_t status = GetEOF(&length);
+    if (status != kStatusOK || length == 0)
+        return status;
+    void* block = std::malloc(static_cast<std::size_t>(length));
+    if (block == nullptr)
+        return kStatusOutOfMemory;
+    status = Read(block, static_cast<long>(length));
+    if (status != kStatusOK) {
+        std::free(block);
+        return status;
+    }
+    *data = block;
+    *size = static_cast<long>(length);
+    return kStatusOK;
+}
+
+std::int32_t CFileIO::UnRead(long count)
+{
+    long long mark = 0;
+    if (__builtin_sub_overflow(mMark, count, &mark))
+        return kStatusParameterError;
+    mMark = std::max(mark, 0LL);
+    return mark < 0 ? kStatusBeforeStart : kStatusOK;
+}
+
+std::int32_t CFileIO::Write(const void* buffer, long long position, long count)
+{
+    if (count < 0 || (buffer == nullptr && count > 0))
+        return kStatusParameterError;
+    const std::int32_t status = FlushWCache();
+    return status != kStatusOK ? status : WriteThrough(buffer, position, count);
+}
+
+std::int32_t CFileIO::Write(const void* buffer, long count)
+{
+    if (count < 0 || (buffer == nullptr && count > 0))
+        return kStatusParameterError;
+    if (mWriteCache && count <= mWriteCacheCapacity - Pending()) {
+        std::copy_n(static_cast<const char*>(buffer), count, mWriteCacheFill);
+        mWriteCacheFill += count;
+        return kStatusOK;
+    }
+    std::int32_t status = FlushWCache();
+    if (status == kStatusOK)
+        status = WriteThrough(buffer, mMark, count);
+    if (status == kStatusOK)
+        mMark += count;
+    return status;
+}
+
+/// To the file or memory block itself, past the write cache.
+std::int32_t CFileIO::WriteThrough(const void* buffer, long long position, long count)
+{
+    if (IsMemoryFile())
+        return WriteToMemory(buffer, position, count);
+    mCacheLength = 0;
+    for (long written = 0; written < count;) {
+        const long piece = std::min(count - written, kLargestPiece);
+        const std::int64_t put =
+            platform::systemCalls().pwrite(mDescriptor, static_cast<const std::byte*>(buffer) + written,
+                                           static_cast<std::size_t>(piece), position + written);
+        if (put == 0)
+            return kStatusDiskFull;
+        if (put < 0 && errno != EINTR)
+            return PosixErrorToOSErr();
+        written += static_cast<long>(std::max<std::int64_t>(put, 0));
+    }
+    return kStatusOK;
+}
+
+std::int32_t CFileIO::WriteToMemory(const void* buffer, long long position, long count)
+{
+    if (count == 0)
+        return kStatusOK;
+    if (position < 0)
+        return kStatusParameterError;
+    long long end = 0;
+    if (__builtin_add_overflow(position, count, &end))
+        return kStatusFileTooBig;
+    if (!mCache || end > static_cast<long long>(mCache->size())) {
+        const std::int32_t status = ResizeMemory(end);
+        if (status != kStatusOK)
+            return status;
+    }
+    std::memcpy(mCache->data() + position, buffer, static_cast<std::size_t>(count));
+    return kStatusOK;
+}
+
+std::int32_t CFileIO::Flush()
+{
+    if (mDescriptor >= 0 && platform::systemCalls().fsync(mDescriptor) != 0)
+        return PosixErrorToOSErr();
+    return kStatusOK;
+}
+
+long long CFileIO::GetEOF() const
+{
+    long long length = 0;
+    GetEOF(&length);
+    return length;
+}
+
+std::int32_t CFileIO::GetEOF(long long* length) const
+{
+    if (length == nullptr)
+        return kStatusParameterError;
+    *length = 0;
+    if (IsMemoryFile()) {
+        *length = mCache ? static_cast<long long>(mCache->size()) : 0;
+        return kStatusOK;
+    }
+    platform::FileStatus status;
+    if (!platform::systemCalls().status(mDescriptor, &status))
+        return PosixErrorToOSErr();
+    *length = status.size;
+    return kStatusOK;
+}
+
+std::int32_t CFileIO::SetEOF(long long length)
+{
+    if (IsMemoryFile()) {
+        const std::int32_t status = ResizeMemory(length);
+        if (status != kStatusOK)
+            return status;
+    } else {
+        mCacheLength = 0; // it may hold bytes that are cut off
+        while (platform::systemCalls().ftruncate(mDescriptor, length) != 0) {
+            if (errno != EINTR)
+                return PosixErrorToOSErr();
+        }
+    }
+    mMark = std::min(mMark, length);
+    return kStatusOK;
+}
+
+std::int32_t CFileIO::ResizeMemory(long long length)
+{
+    if (length < 0)
+        return kStatusParameterError;
+    if (!mCache)
+        mCache = std::make_shared<KTMem>();
+    if (!mCache->reallocate(static_cast<std::size_t>(length)))
+        return kStatusOutOfMemory;
+    mCacheLength = length;
+    return kStatusOK;
+}
+
+std::int32_t CFileIO::Allocate(long long length, bool preallocate)
+{
+    long long end = 0;
+    if (preallocate && !IsMemoryFile() && GetEOF(&end) == kStatusOK)
+        platform::systemCalls().preallocate(mDescriptor, end, length); // the space may as well come later
+    return SetEOF(length);
+}

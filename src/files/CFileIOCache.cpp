@@ -1,0 +1,101 @@
+// The two caches of CFileIO: their sizes, what they hold, when they are emptied.
+#include "files/CFileIO.h"
+
+#include <algorithm>
+#include <cstring>
+
+/// Copies what the cached range holds of a request, from its position on, and returns how much that was.
+long CFileIO::CopyFromCache(void* buffer, long long position, long count) const
+{
+    // Another owner of the block may have made it smaller.
+    const long long held = std::min(mCacheLength, static_cast<long long>(mCache->size()));
+    const long long skip = position - mCacheOffset;
+    if (position < mCacheOffset || skip >= held)
+        return 0;
+    const auto copied = static_cast<std::size_t>(std::min<long long>(count, held - skip));
+    std::memcpy(buffer, mCache->data() + skip, copied);
+    return static_cast<long>(copied);
+}
+
+/// Fills the cache from a position; false, and the cache empty, when not even `needed` bytes came. A block that reaches
+/// beyond the end of the file holds what there is.
+bool CFileIO::Refill(long long position, long needed)
+{
+    const auto size = static_cast<long>(mCache->size());
+    mCacheLength = 0;
+    if (needed > size)
+        return false;
+    long filled = 0;
+    if (ReadDirect(mCache->data(), position, size, needed, &filled) != kStatusOK)
+        return false;
+    mCacheOffset = position;
+    mCacheLength = filled;
+    return true;
+}
+
+std::int32_t CFileIO::SetCache(long size)
+{
+    if (size < 0)
+        return kStatusParameterError;
+    return SetCache(std::make_shared<KTMem>(static_cast<std::size_t>(size)));
+}
+
+std::int32_t CFileIO::SetCache(const std::shared_ptr<KTMem>& block)
+{
+    mCache = block;
+    mCacheOffset = 0;
+    mCacheLength = IsMemoryFile() && block ? static_cast<long long>(block->size()) : 0;
+    return kStatusOK;
+}
+
+void CFileIO::ResetCache()
+{
+    SetCache(std::shared_ptr<KTMem>());
+}
+
+std::int32_t CFileIO::SetWCache(int size)
+{
+    if (size < 0)
+        return kStatusParameterError;
+    const std::int32_t status = FlushWCache();
+    if (status != kStatusOK)
+        return status;
+    AdoptWriteCache(size > 0 ? std::unique_ptr<char[]>(new char[static_cast<std::size_t>(size)]) : nullptr, size);
+    return kStatusOK;
+}
+
+std::int32_t CFileIO::SetWCache(char* buffer, long size)
+{
+    if (size < 0)
+        return kStatusParameterError;
+    const std::int32_t status = FlushWCache();
+    if (status != kStatusOK)
+        return status;
+    AdoptWriteCache(std::unique_ptr<char[]>(buffer), buffer != nullptr ? size : 0);
+    return kStatusOK;
+}
+
+void CFileIO::AdoptWriteCache(std::unique_ptr<char[]> buffer, long long size)
+{
+    mWriteCache = std::move(buffer);
+    mWriteCacheFill = mWriteCache.get();
+    mWriteCacheCapacity = size;
+}
+
+void CFileIO::DeAllocWCache()
+{
+    AdoptWriteCache(nullptr, 0);
+}
+
+std::int32_t CFileIO::FlushWCache()
+{
+    const auto pending = static_cast<long>(Pending());
+    if (pending == 0)
+        return kStatusOK;
+    const std::int32_t status = WriteThrough(mWriteCache.get(), mMark, pending);
+    if (status != kStatusOK)
+        return status;
+    mMark += pending;
+    mWriteCacheFill = mWriteCache.get();
+    return kStatusOK;
+}

@@ -1,0 +1,106 @@
+// The operations of CFileIO that pass over a whole file.
+#include "files/CFileIO.h"
+
+#include "platform/SystemCalls.h"
+#include "platform/core/CRC32.h"
+
+#include <algorithm>
+#include <array>
+#include <cerrno>
+#include <memory>
+#include <new>
+
+namespace {
+
+constexpr long kMovePiece = 1048576;
+constexpr long kCRCPiece = 10240;
+constexpr std::uint32_t kNoCRC = 0xFFFFFFFF;
+
+} // namespace
+
+std::int32_t CFileIO::BlockMove(long long from, long long to)
+{
+    if (!IsOpenForWriting())
+        return kStatusNotOpen;
+    if (from == to)
+        return kStatusOK;
+    long long length = 0;
+    std::int32_t status = FlushWCache();
+    if (status == kStatusOK)
+        status = GetEOF(&length);
+    if (status != kStatusOK)
+        return status;
+    if (from < 0 || to < 0 || from > length)
+        return kStatusParameterError;
+    return to > from ? MoveUp(from, to - from, length) : MoveDown(from, from - to, length);
+}
+
+/// Backwards from the end, so that no byte is overwritten before it is read.
+std::int32_t CFileIO::MoveUp(long long from, long long distance, long long length)
+{
+    long long newLength = 0;
+    if (__builtin_add_overflow(length, distance, &newLength))
+        return kStatusFileTooBig;
+    const std::unique_ptr<char[]> buffer(new (std::nothrow) char[kMovePiece]);
+    if (!buffer)
+        return kStatusOutOfMemory;
+    std::int32_t status = ReserveBehind(length, distance);
+    if (status == kStatusOK)
+        status = SetEOF(newLength);
+    for (long long end = length; end > from && status == kStatusOK;) {
+        const auto piece = static_cast<long>(std::min<long long>(kMovePiece, end - from));
+        end -= piece;
+        status = ReadPiece(buffer.get(), end, piece);
+        if (status == kStatusOK)
+            status = WriteThrough(buffer.get(), end + distance, piece);
+    }
+    return status;
+}
+
+std::int32_t CFileIO::MoveDown(long long from, long long distance, long long length)
+{
+    const std::unique_ptr<char[]> buffer(new (std::nothrow) char[kMovePiece]);
+    if (!buffer)
+        return kStatusOutOfMemory;
+    std::int32_t status = kStatusOK;
+    for (long long position = from; position < length && status == kStatusOK;) {
+        const auto piece = static_cast<long>(std::min<long long>(kMovePiece, length - position));
+        status = ReadPiece(buffer.get(), position, piece);
+        if (status == kStatusOK)
+            status = WriteThrough(buffer.get(), position - distance, piece);
+        position += piece;
+    }
+    return status == kStatusOK ? SetEOF(length - distance) : status;
+}
+
+/// Asks for the space first: a disk that turned out to be full in the middle of a move would leave the file torn.
+std::int32_t CFileIO::ReserveBehind(long long end, long long size)
+{
+    if (IsMemoryFile() || platform::systemCalls().preallocate(mDescriptor, end, size) == 0)
+        return kStatusOK;
+    return errno == ENOSPC || errno == EDQUOT ? PosixErrorToOSErr() : kStatusOK; // else: not every file system can
+}
+
+/// Past the read cache: what is moved is read once.
+std::int32_t CFileIO::ReadPiece(void* buffer, long long position, long count)
+{
+    if (IsMemoryFile())
+        return Read(buffer, position, count, nullptr);
+    long ignored = 0;
+    return ReadDirect(buffer, position, count, count, &ignored);
+}
+
+std::uint32_t CFileIO::CRC()
+{
+    std::array<char, kCRCPiece> buffer;
+    std::uint32_t crc = 0;
+    for (long long left = GetEOF(); left > 0;) {
+        const auto piece = static_cast<long>(std::min<long long>(kCRCPiece, left));
+        // Kept: from the mark on and not from the start, which is for the caller to set.
+        if (Read(buffer.data(), piece) != kStatusOK)
+            return kNoCRC;
+        crc = ECCRC32(crc, buffer.data(), static_cast<std::size_t>(piece));
+        left -= piece;
+    }
+    return crc;
+}

@@ -1,0 +1,159 @@
+// How CFileIO opens and closes.
+#include "files/CFileIO.h"
+
+#include "files/CFileUtil.h"
+#include "platform/Bookmark.h"
+#include "platform/SystemCalls.h"
+
+#include <array>
+
+namespace {
+
+constexpr std::uint32_t kNewFilePermissions = 0644;
+constexpr std::int64_t kLargestAliasFile = 8192; // a bookmark holds a path and little more
+
+/// Whether an open file is to be resolved as an alias instead. Its length answers for nearly every audio file, so that
+/// opening one costs no read.
+bool IsAliasFile(int descriptor, const platform::FileStatus& status)
+{
+    if (status.size == 0 || status.size > kLargestAliasFile)
+        return false;
+    std::array<std::byte, 64> start;
+    const std::int64_t got = platform::systemCalls().pread(descriptor, start.data(), start.size(), 0);
+    return got > 0 && platform::looksLikeBookmark(BytesView(start).first(static_cast<std::size_t>(got)));
+}
+
+platform::OpenFor AccessOf(unsigned int mode)
+{
+    return (mode & kFileIOReadWrite) != 0 ? platform::OpenFor::readingAndWriting : platform::OpenFor::reading;
+}
+
+} // namespace
+
+CFileIO::CFileIO(const CFileRef& ref, unsigned int mode)
+{
+    Open(ref, mode);
+}
+
+CFileIO::~CFileIO()
+{
+    Close();
+}
+
+void CFileIO::Init()
+{
+    CloseDescriptor();
+    DeAllocWCache();
+    ResetCache();
+    mMark = 0;
+    CFileRef::ReInit();
+}
+
+std::int32_t CFileIO::Open(const CFileRef& ref, unsigned int mode)
+{
+    if (&ref == this) {
+        const CFileRef copy(ref);
+        return Open(copy, mode);
+    }
+    FlushWCache();
+    DeAllocWCache();
+    ForgetPosition();
+    CloseDescriptor();
+    CFileRef::ReInit();
+
+    if ((mode & kFileIOMemory) != 0) {
+        if (!mCache)
+            mCache = std::make_shared<KTMem>();
+        mCacheLength = static_cast<long long>(mCache->size());
+        mLengthAtOpen = mCacheLength;
+        mMode = mode;
+        return kStatusOK;
+    }
+    const std::int32_t status = OpenFile(ref, mode);
+    if (status != kStatusOK)
+        CFileRef::ReInit();
+    return status;
+}
+
+/// Opening a path without links proves at once that there is nothing to resolve, that the file exists and that it is no
+/// folder. Whatever else comes of it is looked at step by step.
+std::int32_t CFileIO::OpenFile(const CFileRef& ref, unsigned int mode)
+{
+    const platform::SystemCalls& system = platform::systemCalls();
+    if (const char* path = ref.GetPath()) {
+        platform::FileStatus status;
+        const int descriptor = system.openFileWithoutLinks(path, AccessOf(mode), &status);
+        if (descriptor >= 0) {
+            if (!IsAliasFile(descriptor, status)) {
+                CFileRef::operator=(ref);
+                Adopt(descriptor, status.size, mode);
+                return kStatusOK;
+            }
+            system.close(descriptor);
+        }
+    }
+    return OpenStepByStep(ref, mode);
+}
+
+std::int32_t CFileIO::OpenStepByStep(const CFileRef& ref, unsigned int mode)
+{
+    CFileRef::operator=(ref);
+    ResolveAlias((mode & kFileIOInteraction) != 0);
+    if (!Exists()) {
+        if ((mode & kFileIOReadWrite) == 0)
+            return kStatusFileNotFound;
+        const std::int32_t status = CFileUtilCreate(*this, 0, 0, kNewFilePermissions);
+        if (status != kStatusOK)
+            return status;
+    }
+    if (IsFolder())
+        return kStatusParameterError;
+    const char* path = GetPath();
+    if (path == nullptr)
+        return kStatusParameterError;
+
+    platform::FileStatus status;
+    const int descriptor = platform::systemCalls().openFile(path, AccessOf(mode), &status);
+    if (descriptor < 0)
+        return PosixErrorToOSErr();
+    Adopt(descriptor, status.size, mode);
+    return kStatusOK;
+}
+
+void CFileIO::Adopt(int descriptor, long long length, unsigned int mode)
+{
+    mDescriptor = descriptor;
+    mLengthAtOpen = length;
+    mMode = mode;
+    constexpr long long worthAHint = 1 << 20; // what is smaller crowds nothing out of the system's cache
+    if (length >= worthAHint)
+        platform::systemCalls().adviseNoReuse(descriptor);
+}
+
+std::int32_t CFileIO::Close()
+{
+    const std::int32_t flushed = FlushWCache();
+    DeAllocWCache();
+    mCacheOffset = mCacheLength = 0;
+    const std::int32_t closed = CloseDescriptor();
+    CFileRef::ReInit();
+    return flushed != kStatusOK ? flushed : closed;
+}
+
+/// Never tried again: after a failure, even an interruption, the descriptor is gone.
+std::int32_t CFileIO::CloseDescriptor()
+{
+    std::int32_t status = kStatusOK;
+    if (mDescriptor >= 0 && platform::systemCalls().close(mDescriptor) != 0)
+        status = PosixErrorToOSErr();
+    mDescriptor = -1;
+    mMode = 0;
+    mLengthAtOpen = 0;
+    return status;
+}
+
+void CFileIO::ForgetPosition()
+{
+    mMark = 0;
+    mCacheOffset = mCacheLength = 0;
+}

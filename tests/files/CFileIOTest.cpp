@@ -1,0 +1,431 @@
+#include "files/CFileIO.h"
+
+#include "files/CFileUtil.h"
+#include "platform/Bookmark.h"
+#include "platform/Log.h"
+#include "platform/core/CRC32.h"
+#include "support/FaultInjection.h"
+#include "support/TemporaryFolder.h"
+
+#include <gtest/gtest.h>
+
+#include <sys/stat.h>
+
+#include <algorithm>
+#include <filesystem>
+#include <random>
+
+namespace fs = std::filesystem;
+
+namespace {
+
+constexpr long long kHuge = std::numeric_limits<long long>::max();
+constexpr std::size_t kMiB = 1048576;
+
+/// Bytes of which no two windows look alike.
+Bytes pattern(std::size_t size)
+{
+    std::minstd_rand random(1);
+    Bytes bytes(size);
+    for (std::byte& byte : bytes)
+        byte = static_cast<std::byte>(random() >> 8);
+    return bytes;
+}
+
+CFileRef fileRef(const std::string& path)
+{
+    return CFileRef(path.c_str(), false);
+}
+
+std::string loggedLine;
+
+class CFileIOTest : public testing::Test {
+protected:
+    CFileIOTest() : handler_(platform::setLogHandler([](const char* line) { loggedLine = line; }))
+    {
+        loggedLine.clear();
+    }
+    ~CFileIOTest() override { platform::setLogHandler(handler_); }
+
+    CFileRef fileOf(const Bytes& bytes) const { return fileRef(folder.write("file", bytes)); }
+
+    const TemporaryFolder folder;
+
+private:
+    platform::LogHandler handler_;
+};
+
+} // namespace
+
+TEST_F(CFileIOTest, OpenRefusesWhatIsNoFile)
+{
+    fs::create_directory(folder / "folder");
+    ASSERT_EQ(mkfifo((folder / "fifo").c_str(), 0600), 0);
+    fs::create_symlink("fifo", folder / "link to fifo");
+    fs::create_symlink("nowhere", folder / "dangling");
+    const struct {
+        std::string path;
+        std::int32_t forReading, forWriting;
+    } cases[] = {
+        {folder / "folder", kStatusParameterError, kStatusParameterError},
+        {folder / "fifo", kStatusNotAFile, kStatusNotAFile},
+        {folder / "link to fifo", kStatusNotAFile, kStatusNotAFile},
+        {"/dev/null", kStatusNotAFile, kStatusNotAFile},
+        {folder / "none/audio", kStatusFileNotFound, kStatusFileNotFound},
+        {folder / "dangling", kStatusFileNotFound, kStatusDuplicateName},
+        {folder / std::string(300, 'n'), kStatusFileNotFound, kStatusBadName},
+        {"", kStatusFileNotFound, kStatusParameterError},
+    };
+    for (const auto& c : cases) {
+        for (const bool write : {false, true}) {
+            SCOPED_TRACE(c.path + (write ? " for writing" : " for reading"));
+            CFileIO io(fileOf(Bytes()), 0); // must not stay open either
+            EXPECT_EQ(io.Open(fileRef(c.path), write ? 1 : 0), write ? c.forWriting : c.forReading);
+            EXPECT_FALSE(io.IsValid() || io.IsOpen() || io.Mode() != 0);
+        }
+    }
+}
+
+TEST_F(CFileIOTest, OpenForWritingCreatesAndKeeps)
+{
+    const CFileRef file = fileRef(folder / "new");
+    CFileIO io;
+    const mode_t mask = umask(022);
+    ASSERT_EQ(io.OpenReadWrite(file, 0x40), kStatusOK);
+    umask(mask);
+    EXPECT_EQ(io.Mode(), 0x41u); // unknown bits are kept
+    struct stat status = {};
+    ASSERT_EQ(stat(file.GetPath(), &status), 0);
+    EXPECT_EQ(status.st_mode & 07777, 0644u);
+    EXPECT_EQ(io.Write("abc", 3), kStatusOK);
+    EXPECT_EQ(io.Open(io, 0), kStatusOK); // its own base
+    EXPECT_EQ(io.GetEOF(), 3);
+    EXPECT_FALSE(io.IsOpenForWriting());
+    EXPECT_EQ(CFileUtilCreate(file, 0, 0, 0644), kStatusDuplicateName);
+}
+
+TEST_F(CFileIOTest, OpenResolvesLinksAndAliases)
+{
+    const std::string file = folder.write("audio", "0123456789");
+    fs::create_symlink("audio", folder / "link");
+    fs::create_directory_symlink(".", folder / "here");
+    const auto bookmark = platform::makeBookmark(*fileRef(file).URL(), {});
+    ASSERT_TRUE(bookmark);
+    folder.write("alias", *bookmark);
+    for (const char* name : {"audio", "link", "here/link", "alias"}) {
+        CFileIO io(fileRef(folder / name), 0);
+        EXPECT_STREQ(io.GetPath(), file.c_str()) << name;
+        EXPECT_EQ(io.LengthAtOpen(), 10) << name;
+    }
+}
+
+TEST_F(CFileIOTest, OpenFailuresAreMapped)
+{
+    const CFileRef file = fileOf(pattern(100));
+    FaultInjector faults;
+    CFileIO io;
+    faults.fail(Call::openFileWithoutLinks, ENOSYS);
+    EXPECT_EQ(io.OpenRead(file, 0), kStatusOK); // a system that cannot refuse links
+    EXPECT_EQ(io.LengthAtOpen(), 100);
+    const std::pair<int, std::int32_t> failures[] = {
+        {EACCES, kStatusAccessDenied}, {EROFS, kStatusWritePermission}, {EMFILE, kStatusTooManyOpenFiles}};
+    for (const auto& [error, status] : failures) {
+        faults.fail(Call::openFileWithoutLinks, error);
+        faults.fail(Call::openFile, error, 1, 9);
+        EXPECT_EQ(io.OpenReadWrite(file, 0), status);
+        EXPECT_FALSE(io.IsValid());
+    }
+    faults.fail(Call::createFile, EROFS);
+    EXPECT_EQ(io.OpenReadWrite(fileRef(folder / "new"), 0), kStatusWritePermission);
+}
+
+// A sampler opens 100,000 loops.
+TEST_F(CFileIOTest, OpeningAndReadingCostsOneOpenAndOneRead)
+{
+    const CFileRef file = fileOf(pattern(65536));
+    FaultInjector faults;
+    CFileIO io(file, 0);
+    io.SetCache(16384);
+    char header[12];
+    for (long long position = 0; position < 16000; position += 1000)
+        EXPECT_EQ(io.Read(header, position, 12, nullptr), kStatusOK);
+    EXPECT_EQ(faults.calls(Call::pread), 1);
+    for (int i = 0; i < 3; ++i)
+        EXPECT_EQ(io.Read(header, 65000 + i, 12, nullptr), kStatusOK);
+    EXPECT_EQ(faults.calls(Call::pread), 2); // the end of the file is not looked for
+    EXPECT_EQ(faults.calls(Call::openFileWithoutLinks), 1);
+    EXPECT_EQ(faults.calls(Call::openFile), 0);
+}
+
+// Every way through the cache delivers what a plain read delivers, status and count included.
+TEST_F(CFileIOTest, CachedReadsEqualPlainReads)
+{
+    const CFileRef file = fileOf(pattern(1000));
+    std::minstd_rand random(7);
+    for (const long cache : {0L, 1L, 7L, 64L, 999L, 1000L, 4096L}) {
+        for (const std::size_t limit : {std::size_t{4096}, std::size_t{13}}) {
+            FaultInjector faults;
+            faults.limitTransfers(limit);
+            CFileIO plain(file, 0), cached(file, 0);
+            ASSERT_EQ(cached.SetCache(cache), kStatusOK);
+            for (int i = 0; i < 300; ++i) {
+                const auto position = static_cast<long long>(random() % 1100);
+                const auto count = static_cast<long>(random() % (i % 2 == 0 ? 40 : 1100));
+                Bytes expected(1100), actual(1100);
+                long expectedCount = -1, actualCount = -1;
+                const auto status = plain.Read(expected.data(), position, count, &expectedCount);
+                EXPECT_EQ(cached.Read(actual.data(), position, count, &actualCount), status);
+                EXPECT_EQ(actualCount, expectedCount);
+                ASSERT_EQ(actual, expected) << "cache " << cache << ", " << count << " at " << position;
+            }
+        }
+    }
+}
+
+TEST_F(CFileIOTest, ReadFailuresAreLoggedAndTellWhatWasDelivered)
+{
+    CFileIO io(fileOf(pattern(100)), 0);
+    char buffer[200];
+    long actual = -1;
+    FaultInjector faults;
+    faults.limitTransfers(30);
+    faults.fail(Call::pread, EINTR, 2, 3);
+    EXPECT_EQ(io.Read(buffer, 0, 100, &actual), kStatusOK);
+    EXPECT_EQ(loggedLine, "");
+    faults.fail(Call::pread, EIO, 3);
+    EXPECT_EQ(io.Read(buffer, 0, 100, &actual), kStatusIOError);
+    EXPECT_EQ(actual, 60);
+    EXPECT_EQ(loggedLine, "Encountered read failure 5 Input/output error");
+    EXPECT_EQ(io.Read(buffer, -1, 20, &actual), kStatusParameterError);
+    EXPECT_EQ(io.Read(buffer, 0, -1, &actual), kStatusParameterError);
+    EXPECT_EQ(io.Read(buffer, kHuge, 3, &actual), kStatusParameterError);
+    EXPECT_EQ(actual, 0);
+    // Damage behind what was asked for must not fail the request.
+    io.SetCache(100);
+    faults.fail(Call::pread, EIO, 2);
+    EXPECT_EQ(io.Read(buffer, 0, 40, &actual), kStatusOK);
+    EXPECT_EQ(actual, 40);
+}
+
+TEST_F(CFileIOTest, ReadsAtTheMark)
+{
+    const Bytes content = pattern(100);
+    CFileIO io(fileOf(content), 0);
+    char buffer[100];
+    EXPECT_EQ(io.Read(buffer, 60L), kStatusOK);
+    EXPECT_EQ(io.Read(buffer, 60L), kStatusEndOfFile);
+    EXPECT_EQ(io.GetMark(), 60); // moves on success only
+    long count = 60;
+    EXPECT_EQ(io.Read(buffer, &count), kStatusEndOfFile);
+    EXPECT_EQ(count, 40);
+    EXPECT_EQ(io.GetMark(), 100); // moves by what was delivered
+    EXPECT_EQ(io.UnRead(70), kStatusOK);
+    EXPECT_EQ(io.GetMark(), 30);
+    EXPECT_EQ(io.UnRead(31), kStatusBeforeStart);
+    EXPECT_EQ(io.GetMark(), 0);
+    EXPECT_EQ(io.Read(buffer, static_cast<long*>(nullptr)), kStatusParameterError);
+
+    void* data = nullptr;
+    long size = -1;
+    ASSERT_EQ(io.Read(&data, &size), kStatusOK);
+    EXPECT_EQ(Bytes(static_cast<std::byte*>(data), static_cast<std::byte*>(data) + size), content);
+    std::free(data);
+    EXPECT_EQ(io.Read(&data, &size), kStatusEndOfFile); // as many bytes as the file is long, from the mark
+    EXPECT_EQ(data, nullptr);
+    ASSERT_EQ(io.Open(fileOf(Bytes()), 0), kStatusOK);
+    EXPECT_EQ(io.Read(&data, &size), kStatusOK);
+    EXPECT_TRUE(data == nullptr && size == 0);
+}
+
+TEST_F(CFileIOTest, WriteCacheHoldsBytesUntilFlushed)
+{
+    const std::string file = folder / "file";
+    const struct {
+        void (*act)(CFileIO& io);
+        const char* written;
+    } cases[] = {
+        {[](CFileIO& io) { EXPECT_EQ(io.FlushWCache(), kStatusOK); }, "abcdef"},
+        {[](CFileIO& io) { EXPECT_EQ(io.Close(), kStatusOK); }, "abcdef"},
+        {[](CFileIO& io) { EXPECT_EQ(io.Open(CFileRef(io), 0), kStatusOK); }, "abcdef"},
+        {[](CFileIO& io) { EXPECT_EQ(io.Write("X", 2, 1), kStatusOK); }, "abXdef"},
+        {[](CFileIO& io) { EXPECT_EQ(io.SetWCache(0), kStatusOK); }, "abcdef"},
+        {[](CFileIO& io) { EXPECT_EQ(io.SetWCache(new char[9], 9), kStatusOK); }, "abcdef"},
+        {[](CFileIO& io) { EXPECT_EQ(io.Write("0123456789", 10), kStatusOK); }, ""}, // fits exactly
+        {[](CFileIO& io) { EXPECT_EQ(io.Write("0123456789-", 11), kStatusOK); }, "abcdef0123456789-"},
+        {[](CFileIO& io) { io.Flush(); }, ""}, // commits what is in the file
+        {[](CFileIO& io) { io.DeAllocWCache(), io.Close(); }, ""},
+        {[](CFileIO& io) { io.Init(); }, ""},
+    };
+    for (const auto& c : cases) {
+        fs::remove(file);
+        CFileIO io(fileRef(file), 1);
+        io.SetWCache(16);
+        EXPECT_EQ(io.Write("abcdef", 6), kStatusOK);
+        EXPECT_EQ(fs::file_size(file), 0u);
+        c.act(io);
+        EXPECT_EQ(textOf(readFile(file)), c.written) << "case " << &c - cases;
+    }
+}
+
+TEST_F(CFileIOTest, WritingAndCuttingMoveMarkAndReadCache)
+{
+    CFileIO io(fileOf(Bytes(100)), 1);
+    io.SetMark(80);
+    io.SetCache(50);
+    char byte = 0;
+    EXPECT_EQ(io.Read(&byte, 10, 1, nullptr), kStatusOK);
+    EXPECT_EQ(io.Write("a", 10, 1), kStatusOK);
+    EXPECT_EQ(io.Read(&byte, 10, 1, nullptr), kStatusOK);
+    EXPECT_EQ(byte, 'a');
+    EXPECT_EQ(io.SetEOF(90), kStatusOK);
+    EXPECT_EQ(io.GetMark(), 80);
+    EXPECT_EQ(io.SetEOF(10), kStatusOK);
+    EXPECT_EQ(io.GetMark(), 10);
+    EXPECT_EQ(io.Read(&byte, 10, 1, nullptr), kStatusEndOfFile);
+}
+
+TEST_F(CFileIOTest, WriteFailuresLoseNothingSilently)
+{
+    const CFileRef file = fileOf(Bytes());
+    FaultInjector faults;
+    CFileIO io(file, 1);
+    faults.limitTransfers(3);
+    faults.fail(Call::pwrite, EINTR, 1, 2);
+    EXPECT_EQ(io.Write("abcdefgh", 0, 8), kStatusOK);
+    faults.fail(Call::pwrite, 0, 2);
+    EXPECT_EQ(io.Write("ABCDEFGH", 8), kStatusDiskFull);
+    EXPECT_EQ(io.GetMark(), 0);
+
+    io.SetWCache(16);
+    EXPECT_EQ(io.Write("ABCDEFGH", 8), kStatusOK);
+    faults.fail(Call::pwrite, ENOSPC, 2);
+    EXPECT_EQ(io.SetWCache(32), kStatusDiskFull); // changes nothing: the bytes stay pending
+    EXPECT_EQ(io.FlushWCache(), kStatusOK);
+    EXPECT_EQ(io.GetMark(), 8);
+    EXPECT_EQ(textOf(readFile(file.GetPath())), "ABCDEFGH");
+
+    EXPECT_EQ(io.Write("more", 4), kStatusOK);
+    faults.fail(Call::pwrite, EDQUOT);
+    faults.fail(Call::close, EIO);
+    EXPECT_EQ(io.Close(), kStatusQuotaExceeded); // the first error wins
+    EXPECT_FALSE(io.IsOpen());
+    ASSERT_EQ(io.Open(file, 1), kStatusOK);
+    faults.fail(Call::fsync, EIO);
+    EXPECT_EQ(io.Flush(), kStatusIOError);
+    faults.fail(Call::ftruncate, EFBIG);
+    EXPECT_EQ(io.SetEOF(99), kStatusFileTooBig);
+    faults.fail(Call::preallocate, ENOSPC);
+    EXPECT_EQ(io.Allocate(99, true), kStatusOK); // only a request
+    EXPECT_EQ(io.GetEOF(), 99);
+    faults.fail(Call::close, EIO);
+    EXPECT_EQ(io.Close(), kStatusIOError);
+    EXPECT_EQ(io.Close(), kStatusOK);
+}
+
+TEST_F(CFileIOTest, BlockMoveKeepsTheTail)
+{
+    const struct {
+        std::size_t size, from, to;
+    } cases[] = {{1000, 100, 50},         {1000, 50, 100},        {1000, 1000, 1100},  {1000, 1000, 0},
+                 {3 * kMiB + 5, 10, 17},  {3 * kMiB + 5, 17, 10}, {2 * kMiB, 0, kMiB}, {2 * kMiB + 1, kMiB, 0},
+                 {kMiB + 1, 1, 3 * kMiB}, {1000, 500, 500}};
+    for (const unsigned int mode : {0x0001u, 0x8001u}) {
+        for (const auto& c : cases) {
+            SCOPED_TRACE(testing::Message() << c.size << ": " << c.from << " to " << c.to << ", mode " << mode);
+            Bytes expected = pattern(c.size);
+            CFileIO io(fileOf(Bytes()), mode);
+            ASSERT_EQ(io.Write(expected.data(), 0, static_cast<long>(c.size)), kStatusOK);
+            ASSERT_EQ(io.BlockMove(static_cast<long long>(c.from), static_cast<long long>(c.to)), kStatusOK);
+            Bytes found(c.size + c.to - c.from);
+            ASSERT_EQ(io.GetEOF(), static_cast<long long>(found.size()));
+            ASSERT_EQ(io.Read(found.data(), 0, static_cast<long>(found.size()), nullptr), kStatusOK);
+            // The old bytes between the two places may be anything.
+            const auto kept = static_cast<std::ptrdiff_t>(std::min(c.from, c.to));
+            EXPECT_TRUE(std::equal(found.begin(), found.begin() + kept, expected.begin()));
+            const auto moved = static_cast<std::ptrdiff_t>(c.size - c.from);
+            EXPECT_TRUE(std::equal(found.end() - moved, found.end(), expected.end() - moved));
+        }
+    }
+}
+
+TEST_F(CFileIOTest, BlockMoveStopsAtTheFirstFailure)
+{
+    const Bytes content = pattern(3 * kMiB);
+    const CFileRef file = fileOf(content);
+    CFileIO io(file, 0);
+    EXPECT_EQ(io.BlockMove(0, 10), kStatusNotOpen);
+    ASSERT_EQ(io.Open(file, 1), kStatusOK);
+    EXPECT_EQ(io.BlockMove(-1, 10), kStatusParameterError);
+    EXPECT_EQ(io.BlockMove(3 * kMiB + 1, 3 * kMiB), kStatusParameterError);
+    EXPECT_EQ(io.BlockMove(0, kHuge), kStatusFileTooBig);
+    FaultInjector faults;
+    faults.fail(Call::preallocate, ENOSPC);
+    EXPECT_EQ(io.BlockMove(0, 10), kStatusDiskFull);
+    EXPECT_EQ(readFile(file.GetPath()), content); // a full disk is found before anything is moved
+    faults.fail(Call::preallocate, EOPNOTSUPP);
+    faults.fail(Call::pwrite, EIO, 2);
+    EXPECT_EQ(io.BlockMove(0, 10), kStatusIOError);
+    EXPECT_EQ(faults.calls(Call::pwrite), 2);
+    faults.fail(Call::pread, EIO);
+    EXPECT_EQ(io.BlockMove(10, 0), kStatusIOError);
+    EXPECT_EQ(io.GetEOF(), static_cast<long long>(3 * kMiB + 10)); // not cut
+}
+
+TEST_F(CFileIOTest, CRCRunsFromTheMark)
+{
+    const Bytes content = pattern(25000);
+    CFileIO io(fileOf(content), 0);
+    EXPECT_EQ(io.CRC(), ECCRC32(0, content.data(), content.size()));
+    EXPECT_EQ(io.GetMark(), 25000);
+    EXPECT_EQ(io.CRC(), 0xFFFFFFFFu);
+    io.Close();
+    EXPECT_EQ(io.CRC(), 0u); // no length to be had
+}
+
+TEST_F(CFileIOTest, MemoryFileIsItsCacheBlock)
+{
+    CFileIO io(CFileRef::None, 0x8001);
+    EXPECT_TRUE(io.IsOpen() && !io.IsValid());
+    EXPECT_EQ(io.Write("abc", 5, 3), kStatusOK); // the gap is zeros
+    io.SetWCache(4);
+    io.SetMark(8);
+    EXPECT_EQ(io.Write("de", 2), kStatusOK);
+    EXPECT_EQ(io.GetEOF(), 8);
+    EXPECT_EQ(io.FlushWCache(), kStatusOK);
+    char text[16] = {};
+    long actual = 0;
+    EXPECT_EQ(io.Read(text, 4, 10, &actual), kStatusEndOfFile);
+    EXPECT_EQ(std::string(text, 6), std::string("\0abcde", 6));
+    EXPECT_EQ(actual, 6);
+    EXPECT_EQ(io.Write("x", -1, 1), kStatusParameterError);
+    EXPECT_EQ(io.Write("x", kHuge, 1), kStatusFileTooBig);
+    EXPECT_EQ(io.Allocate(3, true), kStatusOK);
+    EXPECT_EQ(io.GetMark(), 3);
+
+    // Closing keeps the block, and it may be lent to others.
+    CFileIO other;
+    other.SetCache(io.CacheBlock());
+    EXPECT_EQ(io.Close(), kStatusOK);
+    EXPECT_FALSE(io.IsOpen());
+    EXPECT_EQ(other.Open(CFileRef::None, 0x8000), kStatusOK);
+    EXPECT_EQ(other.LengthAtOpen(), 3);
+    EXPECT_EQ(other.BlockMove(0, 1), kStatusNotOpen);
+    other.SetCache(5L);
+    EXPECT_EQ(other.GetEOF(), 5);
+    other.ResetCache();
+    EXPECT_EQ(other.GetEOF(), 0);
+    EXPECT_EQ(other.SetEOF(2), kStatusOK);
+    EXPECT_EQ(other.GetEOF(), 2);
+}
+
+TEST_F(CFileIOTest, OffsetsBeyond32BitsAreKept)
+{
+    CFileIO io(fileRef(folder / "sparse"), 1);
+    const long long position = (200LL << 30) + 7;
+    ASSERT_EQ(io.Write("end", position, 3), kStatusOK);
+    EXPECT_EQ(io.GetEOF(), position + 3);
+    io.SetCache(64);
+    char text[4] = {};
+    EXPECT_EQ(io.Read(text, position, 3, nullptr), kStatusOK);
+    EXPECT_STREQ(text, "end");
+}

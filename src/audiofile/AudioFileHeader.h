@@ -15,6 +15,8 @@ inline constexpr std::size_t kMaxAudioFileHeaderSize = 4096;
 /// nothing: an unknown type, a format that the type cannot hold, more frames than its size fields can say.
 /// `fileType` is "WAVE" (little-endian; 8 bits unsigned), "AIFF" (big-endian; floats as AIFC), or "caff"
 /// (little-endian). `bits` is 8, 16, 24, 32 or 64, -32 for 32-bit floats; 64 means floats. `channels` of 0 stands for
-/// those of `busFormat`. `option` reserves room ("JUNK") in a WAVE file to grow past 4 GiB, and makes it RF64 once it has.
+/// those of `busFormat`; with more than two of them, WAVE and CAF files name the bus format's speakers. WAVE is
+/// extensible for more than 16 bits or two channels. `option` reserves room ("JUNK") in a WAVE file to grow past 4 GiB,
+/// and makes it RF64 once it has.
 KT_EXPORT long BuildAudioFileHeader(void* buffer, FourCC fileType, long long frames, long long sampleRate, int channels,
                                     int bits, TAudioBusFormat busFormat, bool option);

@@ -29,9 +29,9 @@ enum TAudioBusFormat : int {
 };
 
 struct KT_EXPORT AudioFileInfo {
-    FourCC fileType = 0; // "WAVE", "AIFF" (AIFC too), "caff", "REX2"; 0 when unknown
+    FourCC fileType = 0;             // "WAVE", "AIFF" (AIFC too), "caff", "REX2"; 0 when unknown
     std::int64_t sampleRate = 44100; // frames per second, rounded
-    std::int32_t bitsPerSample = 16; // 0 for compressed data
+    std::int32_t bitsPerSample = 16; // of a sample's container: 24 for 20 bits in 3 bytes; 0 for compressed data
     std::int32_t channels = 1;
     bool byteSwapped = false; // samples in the other byte order than the host's
     bool floatingPoint = false;
@@ -39,7 +39,7 @@ struct KT_EXPORT AudioFileInfo {
     std::int64_t frames = 0;
     std::int64_t fileLength = 0;
 
-    // Loop metadata, from the suite's chunks.
+    // Loop metadata. GetAudioFileInfo leaves it as it is here: it is for those who read the suite's chunks to fill.
     float beatCount = 0;         // 0: the file carries none
     std::int32_t timingFlag = 0; // non-zero: the loop's timing is known
     std::int64_t loopCount = 0;  // at least 1, with loopValue above 0: a tagged loop
@@ -61,12 +61,12 @@ struct KT_EXPORT AudioFileInfo {
     std::uint32_t VireoLoopTempo() const;
 };
 
-/// Describes the file that `file` has open. 0; -39 for a file that ends in its header; kStatusParameterError for one that
-/// is no audio file known here, `info` then holding what was understood (fileType 0, fileLength). `permission` is the
-/// mode that the file was opened with. The mark stays where it was.
+/// Describes the file that `file` has open. 0; -39 for a file that ends in its header; kStatusParameterError for one
+/// that is no audio file known here, `info` then holding what was understood (fileType 0, fileLength). `permission` is
+/// the mode that the file was opened with. The mark stays where it was.
 KT_EXPORT std::int32_t GetAudioFileInfo(CFileIO& file, unsigned int permission, AudioFileInfo& info);
 
 /// Channels of a bus format; 0 for values outside 1 to 14.
 KT_EXPORT int AudioBusFormatChannels(int busFormat);
-/// The plainest bus format of that many channels; kAudioBusUndefined when there is none.
+/// The first bus format of that many channels; kAudioBusUndefined when there is none.
 KT_EXPORT TAudioBusFormat AudioBusFormatForChannels(int channels);

@@ -12,6 +12,6 @@ KT_EXPORT std::int64_t MaxAudioFileSize(unsigned int fileType, bool flag);
 KT_EXPORT std::uint64_t MaxNumberOfFramesInAudioFile(int fileType, int bitsPerSample, int busFormat);
 /// Whether sample bytes must be swapped on a little-endian host.
 KT_EXPORT bool AudioFileDataNeedsSwap(unsigned int fileType, int bitsPerSample, unsigned int formatCode);
-/// Beats of a loop whose file does not say: a guess that puts its tempo between 70 and 140.5 beats per minute; 0 when the
-/// file knows, and for files too short or longer than a minute. The third argument is ignored.
+/// Beats of a loop whose file does not say: a guess that puts its tempo between 70 and 140.5 beats per minute; 0 when
+/// the file knows, and for files too short or longer than a minute. The third argument is ignored.
 KT_EXPORT float CalculateBeatCountForFile(const AudioFileInfo* info, int count, int);

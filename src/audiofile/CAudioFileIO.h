@@ -9,8 +9,12 @@
 #include "platform/AudioFileService.h"
 #include "platform/ContentType.h"
 
+#include <cstdint>
 #include <functional>
+#include <memory>
 #include <optional>
+
+class FileWindow;
 
 /// One chunk of a container as a walk meets it.
 struct ChunkEntry {
@@ -26,9 +30,11 @@ struct ContainerExtent {
     std::int64_t fileLength = 0;
 };
 
+/// Of a file that is open for reading only, container headers are kept once read: what another writes there meanwhile
+/// is seen when it is opened anew.
 class KT_EXPORT CAudioFileIO : public CFileIO {
 public:
-    CAudioFileIO() = default;
+    CAudioFileIO();
     /// Stays closed when write access is asked to what has no path, does not exist or is a directory.
     CAudioFileIO(const CFileRef& ref, unsigned int permission);
     ~CAudioFileIO() override;
@@ -45,7 +51,8 @@ public:
     /// Bits per sample; -32 for 32-bit floats.
     std::int32_t SampleFormat() const { return mSampleFormat; }
 
-    /// "WAVE", "AIFF", "REX2", or 0: what kind of chunked container is open. CAF files have a walk of their own and give 0.
+    /// "WAVE", "AIFF", "REX2", or 0: what kind of chunked container is open. CAF files have a walk of their own and
+    /// give 0.
     FourCC IsChunkBased();
     /// 0, or -3.
     std::int32_t ReadExtendedFileHeader(ContainerChkExtended& header);
@@ -68,7 +75,8 @@ public:
     std::int32_t AddChunk(unsigned int id, const void* data, long size, bool replace);
     std::int32_t AddChunk(const CChunkData& chunk, bool replace);
     std::int32_t AddChunk(unsigned int id, BytesView data, bool replace);
-    /// Removes every chunk of that id (in CAF the first): one ahead of the samples is renamed "free", others are cut out.
+    /// Removes every chunk of that id (in CAF the first): one ahead of the samples is renamed "free", others are cut
+    /// out.
     std::int32_t RemoveChunk(unsigned int id);
 
     /// Rewrites the header from the description when samples were written.
@@ -76,12 +84,13 @@ public:
     /// Rewrites the header for a number of frames and sets the file's length to match.
     std::int32_t SetNumFrames(long frames);
 
-    /// Frames from `frame` on as interleaved floats in [-1, 1); `framesRead` (may be null) receives how many were delivered, also on
-    /// failure. kStatusEndOfFile when fewer than asked were there; kStatusParameterError for data that is not linear PCM.
+    /// Frames from `frame` on as interleaved floats in [-1, 1); `framesRead` (may be null) receives how many were
+    /// delivered, also on failure. kStatusEndOfFile when fewer than asked were there; kStatusParameterError for data
+    /// that is not linear PCM.
     std::int32_t ReadFrames(float* to, long long frame, long count, long* framesRead = nullptr);
-    /// Writes interleaved floats at `frame`, which is at most the frame count; the frame count grows, and the header is rewritten by
-    /// UpdateHeader or Close. kStatusFileTooBig when the container cannot hold that many; kStatusParameterError when bytes
-    /// that are no samples lie behind the sample data and would be written over.
+    /// Writes interleaved floats at `frame`, which is at most the frame count; the frame count grows, and the header is
+    /// rewritten by UpdateHeader or Close. kStatusFileTooBig when the container cannot hold that many;
+    /// kStatusParameterError when bytes that are no samples lie behind the sample data and would be written over.
     std::int32_t WriteFrames(const float* from, long long frame, long count);
 
     /// Reverses the bytes of a value unless the open file is "WAVE".
@@ -95,7 +104,8 @@ public:
     // A CAF file carries the suite's chunks as "uuid" user-data items: 16 bytes of UUID, then the chunk's body. These
     // work on a handle of the audio-file service, not on the file that this object has open.
 
-    /// Opens the file for reading and writing and calls `block` with the handle; nothing happens when it cannot be opened.
+    /// Opens the file for reading and writing and calls `block` with the handle; nothing happens when it cannot be
+    /// opened.
     static void PerformAudioFileOperations(const CFileRef& ref, const std::function<void(platform::AudioFile&)>& block);
     /// `data` and `size` include the UUID and are valid during the call only; `index` is always 0.
     using UUIDChunkBlock =
@@ -111,9 +121,25 @@ public:
 
 private:
     bool IsOpenCAF() const { return mInfo.fileType == kCaff; }
-    // The walk, find and edit steps that the public operations share are declared by their implementation.
+    std::int32_t PrepareToWrite(long long frame, long count);
+    void FramesWritten(long long frames);
+    /// Where a chunk stands.
+    struct FoundChunk {
+        std::int64_t position = 0; // of the header
+        std::int64_t body = 0;
+        std::int64_t size = 0;
+        std::int64_t next = 0;
+        std::int64_t fileLength = 0; // when it was found
+        bool HasItsBytes() const { return size >= 0 && size <= fileLength - body; }
+    };
+    std::int32_t Locate(FourCC id, FoundChunk& found);
+    FileWindow& Window(std::optional<FileWindow>& own);
+    std::int32_t ReadBytes(void* to, const FoundChunk& found);
+    std::int32_t ReadBody(const FoundChunk& found, std::unique_ptr<char[]>& data);
+    void Describe(unsigned int permission);
 
     AudioFileInfo mInfo;
+    std::unique_ptr<FileWindow> mWindow; // on a file that is open for reading; null otherwise
     std::int32_t mSampleFormat = 0;
     bool mHeaderDirty = false;
     bool mHeaderOption = false;

@@ -32,9 +32,9 @@ inline constexpr std::int32_t kChunkSizeTooLarge = -9;
 
 /// The 12 bytes at the start of a container.
 struct KT_EXPORT ContainerChk {
-    Packed<FourCC> id;            //  0
-    Packed<std::uint32_t> size;   //  4  bytes from offset 8 to the end of the container
-    Packed<FourCC> formType;      //  8
+    Packed<FourCC> id;          //  0
+    Packed<std::uint32_t> size; //  4  bytes from offset 8 to the end of the container
+    Packed<FourCC> formType;    //  8
 
     /// Unsigned for "WAVE", signed otherwise.
     std::int64_t Size() const;
@@ -59,16 +59,16 @@ struct KT_EXPORT ContainerChkExtended {
     static constexpr std::size_t kHeadersSize = 20;   // container header and first chunk header
     static constexpr std::size_t kDs64FixedSize = 28; // the "ds64" body ahead of its table
 
-    Packed<FourCC> id;                                 //  0
-    Packed<std::uint32_t> size;                        //  4  0xFFFFFFFF: see riffSize
-    Packed<FourCC> formType;                           //  8
-    Packed<FourCC> firstChunkId;                       // 12
-    Packed<std::uint32_t> firstChunkSize;              // 16
-    Packed<std::uint64_t> riffSize;                    // 20
-    Packed<std::uint64_t> dataSize;                    // 28
-    Packed<std::uint64_t> sampleCount;                 // 36  carried, not interpreted
-    Packed<std::uint32_t> tableLength;                 // 44
-    std::array<Ds64TableEntry, kTableCapacity> table;  // 48
+    Packed<FourCC> id;                                //  0
+    Packed<std::uint32_t> size;                       //  4  0xFFFFFFFF: see riffSize
+    Packed<FourCC> formType;                          //  8
+    Packed<FourCC> firstChunkId;                      // 12
+    Packed<std::uint32_t> firstChunkSize;             // 16
+    Packed<std::uint64_t> riffSize;                   // 20
+    Packed<std::uint64_t> dataSize;                   // 28
+    Packed<std::uint64_t> sampleCount;                // 36  carried, not interpreted
+    Packed<std::uint32_t> tableLength;                // 44
+    std::array<Ds64TableEntry, kTableCapacity> table; // 48
 
     bool IsWAVE() const { return formType == kWAVE; }
     bool HasValidDs64() const;

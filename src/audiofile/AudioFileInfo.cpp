@@ -1,0 +1,87 @@
+#include "audiofile/AudioFileInfo.h"
+
+#include "audiofile/ContainerDescriptions.h"
+#include "files/CFileIO.h"
+
+#include <cmath>
+
+namespace {
+
+// What REX2 holds below its first chunk is compressed in a way of its own.
+std::int32_t describeREX2(AudioFileInfo& info)
+{
+    info.containerId = kCAT;
+    info.formType = kREX2;
+    info.compressed = true;
+    info.bitsPerSample = 0;
+    info.channels = 0;
+    SetSampleRate(info, 0);
+    return kStatusOK;
+}
+
+std::int32_t describe(FileWindow& file, AudioFileInfo& info)
+{
+    std::array<std::byte, 16> start{};
+    const std::size_t there = file.readSome(start.data(), 0, start.size());
+    if (there >= 8 && loadBE<FourCC>(start.data()) == kCaff) {
+        info.fileType = kCaff;
+        return DescribeCAF(file, info);
+    }
+    info.fileType = ChunkedContainerKind(start);
+    switch (info.fileType) {
+    case kWAVE:
+        return DescribeWAVE(file, info);
+    case kAIFF:
+        return DescribeAIFF(file, info);
+    case kREX2:
+        return describeREX2(info);
+    default:
+        return kStatusParameterError;
+    }
+}
+
+} // namespace
+
+std::int32_t GetAudioFileInfo(CFileIO& file, unsigned int /*permission*/, AudioFileInfo& info)
+{
+    // no call where none is needed
+    FileWindow window(file, file.IsOpenForWriting() ? file.GetEOF() : file.LengthAtOpen());
+    return DescribeAudioFile(window, info);
+}
+
+std::int32_t DescribeAudioFile(FileWindow& file, AudioFileInfo& info)
+{
+    info = {};
+    info.fileLength = file.length();
+    return describe(file, info);
+}
+
+void SetSampleRate(AudioFileInfo& info, double rate)
+{
+    constexpr double highest = 9007199254740992.0;
+    info.exactSampleRate = rate > 0 && rate <= highest ? rate : 0;
+    info.sampleRate = std::llround(info.exactSampleRate);
+}
+
+void SetLinearPCM(AudioFileInfo& info, int bytesPerSample, bool isFloat, std::endian order, bool isUnsigned)
+{
+    info.formatCode = fourCC("lpcm");
+    info.floatingPoint = isFloat;
+    info.bitsPerSample = bytesPerSample * 8;
+    info.sampleFormat = {info.bitsPerSample, isFloat, isUnsigned, bytesPerSample > 1 ? order : std::endian::native};
+    info.byteSwapped = info.sampleFormat.order != std::endian::native;
+    info.bytesPerFrame = bytesPerSample * info.channels;
+}
+
+void SetSampleData(AudioFileInfo& info, std::int64_t offset, std::uint64_t size)
+{
+    info.dataOffset = offset;
+    const std::int64_t there = std::max<std::int64_t>(info.fileLength - offset, 0);
+    info.dataSize = static_cast<std::int64_t>(std::min<std::uint64_t>(size, static_cast<std::uint64_t>(there)));
+}
+
+std::uint32_t AudioFileInfo::VireoLoopTempo() const
+{
+    const double tempo = beatCount * 300000.0 * static_cast<double>(sampleRate) / static_cast<double>(frames);
+    return static_cast<std::uint32_t>(static_cast<std::int64_t>(tempo));
+}

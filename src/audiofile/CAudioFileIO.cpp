@@ -1,0 +1,199 @@
+// CAudioFileIO: opening and closing, and the header that goes with the samples.
+#include "audiofile/CAudioFileIO.h"
+
+#include "audiofile/AudioFileHeader.h"
+#include "audiofile/ContainerDescriptions.h"
+#include "audiofile/FileWindow.h"
+#include "files/CFileUtil.h"
+#include "platform/SystemCalls.h"
+
+#include <array>
+#include <cstdint>
+#include <cstdio>
+
+namespace {
+
+/// Whether there is something that can be opened for writing. Opening it would tell as well, but creates what is
+/// missing.
+bool isWritableTarget(const CFileRef& ref)
+{
+    const char* path = ref.GetPath();
+    platform::FileStatus status;
+    return path != nullptr && platform::systemCalls().pathStatus(path, &status) &&
+           status.kind != platform::FileKind::directory;
+}
+
+using Header = std::array<char, kMaxAudioFileHeaderSize>;
+
+long buildHeader(Header& header, const AudioFileInfo& info, std::int64_t frames, int sampleFormat, bool option)
+{
+    return BuildAudioFileHeader(header.data(), info.fileType, frames, info.sampleRate, info.channels, sampleFormat,
+                                info.busFormat, option);
+}
+
+} // namespace
+
+CAudioFileIO::CAudioFileIO() = default;
+
+CAudioFileIO::CAudioFileIO(const CFileRef& ref, unsigned int permission)
+{
+    // Kept: here a memory file needs a path too when it is to be written.
+    if ((permission & kFileIOReadWrite) == 0 || isWritableTarget(ref))
+        Open(ref, permission);
+}
+
+CAudioFileIO::~CAudioFileIO()
+{
+    Close();
+}
+
+std::int32_t CAudioFileIO::Open(const CFileRef& ref, unsigned int permission)
+{
+    if (&ref == this) {
+        const CFileRef copy(ref); // closing resets the base
+        return Open(copy, permission);
+    }
+    Close();
+    const bool createsWhatIsMissing = (permission & (kFileIOReadWrite | kFileIOMemory)) == kFileIOReadWrite;
+    if (createsWhatIsMissing && !isWritableTarget(ref))
+        return kStatusFileNotFound;
+    const std::int32_t status = CFileIO::Open(ref, permission);
+    if (status == kStatusOK)
+        Describe(permission);
+    return status;
+}
+
+/// A file that is no audio file is open all the same, and described as far as it was understood.
+void CAudioFileIO::Describe(unsigned int permission)
+{
+    if ((permission & (kFileIOReadWrite | kFileIOMemory)) == 0) {
+        mWindow = std::make_unique<FileWindow>(*this, LengthAtOpen());
+        DescribeAudioFile(*mWindow, mInfo);
+    } else {
+        GetAudioFileInfo(*this, permission, mInfo);
+    }
+    const bool singleFloats = mInfo.bitsPerSample == 32 && mInfo.floatingPoint;
+    mSampleFormat = singleFloats ? -32 : mInfo.bitsPerSample;
+    if ((permission & kFileIOReadWrite) != 0 && mInfo.IsLinearPCM()) {
+        // A header with the reservation must be built with it again, or the samples would not stand behind it.
+        Header header;
+        const auto length = [&](bool option) { return buildHeader(header, mInfo, mInfo.frames, mSampleFormat, option); };
+        mHeaderOption = length(false) != mInfo.dataOffset && length(true) == mInfo.dataOffset;
+    }
+}
+
+std::int32_t CAudioFileIO::Close()
+{
+    const std::int32_t updated = UpdateHeader();
+    mWindow.reset();
+    mInfo = {};
+    mSampleFormat = 0;
+    mHeaderDirty = false;
+    mHeaderOption = false;
+    const std::int32_t closed = CFileIO::Close();
+    return updated != kStatusOK ? updated : closed;
+}
+
+std::int32_t CAudioFileIO::CreateAndOpenCommon(const CFileRef& ref, long cacheSize, TAudioBusFormat busFormat,
+                                               int channels, int bitsPerSample, long sampleRate, unsigned int fileType,
+                                               bool headerOption)
+{
+    constexpr long kibibyte = 1024;
+    if (&ref == this) {
+        const CFileRef copy(ref);
+        return CreateAndOpenCommon(copy, cacheSize, busFormat, channels, bitsPerSample, sampleRate, fileType,
+                                   headerOption);
+    }
+    Header header;
+    const long length =
+        BuildAudioFileHeader(header.data(), fileType, 0, sampleRate, channels, bitsPerSample, busFormat, headerOption);
+    if (length <= 0 || cacheSize < 0 || cacheSize > INT64_MAX / kibibyte)
+        return kStatusParameterError;
+    Close();
+    std::int32_t status = CFileUtilCreate(ref, 0, 0, 0644);
+    const bool created = status == kStatusOK;
+    if (status == kStatusOK || status == kStatusDuplicateName)
+        status = CFileIO::Open(ref, kFileIOReadWrite);
+    if (status == kStatusOK)
+        status = SetEOF(0);
+    if (status == kStatusOK)
+        status = Write(header.data(), 0, length);
+    if (status != kStatusOK) {
+        CFileIO::Close();
+        if (created)
+            std::remove(ref.GetPath());
+        return status;
+    }
+    Describe(kFileIOReadWrite);
+    if (busFormat != kAudioBusUndefined && AudioBusFormatChannels(busFormat) == mInfo.channels)
+        mInfo.busFormat = busFormat; // the channel count alone does not tell
+    mHeaderOption = headerOption;
+    return cacheSize > 0 ? SetCache(cacheSize * kibibyte) : kStatusOK;
+}
+
+/// The flag outlives a failure: what did not get into the file still has to.
+std::int32_t CAudioFileIO::UpdateHeader()
+{
+    if (!mHeaderDirty)
+        return kStatusOK;
+    if (!IsOpenForWriting()) {
+        mHeaderDirty = false;
+        return kStatusOK;
+    }
+    Header header;
+    std::int32_t status = kStatusOK;
+    if (const long length = buildHeader(header, mInfo, mInfo.frames, mSampleFormat, mHeaderOption); length > 0)
+        status = Write(header.data(), 0, length);
+    const bool isPadded = mInfo.fileType == kWAVE || mInfo.fileType == kAIFF;
+    if (const long long end = GetEOF(); status == kStatusOK && isPadded && (end & 1) != 0) {
+        const char pad = 0;
+        status = Write(&pad, end, sizeof pad);
+    }
+    if (status != kStatusOK)
+        return status;
+    mInfo.fileLength = GetEOF();
+    mHeaderDirty = false;
+    return kStatusOK;
+}
+
+std::int32_t CAudioFileIO::SetNumFrames(long frames)
+{
+    Header header;
+    const long length = buildHeader(header, mInfo, frames, mSampleFormat, mHeaderOption);
+    if (length <= 0) // cutting the file all the same would lose what it holds
+        return kStatusParameterError;
+    const std::int64_t dataSize = std::int64_t{frames} * mInfo.channels * (mInfo.bitsPerSample / 8);
+    std::int32_t status = Write(header.data(), 0, length);
+    if (status == kStatusOK)
+        status = SetEOF(length + dataSize);
+    if (status != kStatusOK)
+        return status;
+    mInfo.dataOffset = length;
+    mInfo.frames = frames;
+    mInfo.dataSize = dataSize;
+    mInfo.fileLength = length + dataSize;
+    return kStatusOK;
+}
+
+void CAudioFileIO::ByteOrder(int* value) const
+{
+    if (mInfo.fileType != kWAVE && value != nullptr)
+        *value = byteSwapped(*value);
+}
+
+void CAudioFileIO::ByteOrder(unsigned int* value) const
+{
+    if (mInfo.fileType != kWAVE && value != nullptr)
+        *value = byteSwapped(*value);
+}
+
+bool CAudioFileIO::IsSupportedFileType(const platform::String& contentTypeIdentifier)
+{
+    return IsSupportedFileType(platform::ContentType(contentTypeIdentifier));
+}
+
+bool CAudioFileIO::IsSupportedFileType(const platform::ContentType& contentType)
+{
+    return contentType.conformsTo(platform::ContentType::audio()) &&
+           !contentType.conformsTo(platform::ContentType::flac());
+}

@@ -1,0 +1,321 @@
+#include "audiofile/ContainerEditor.h"
+
+#include "audiofile/ContainerWalk.h"
+#include "files/CFileIO.h"
+
+#include <algorithm>
+#include <array>
+#include <memory>
+#include <new>
+
+namespace {
+
+constexpr std::uint32_t kSizeElsewhere = 0xFFFFFFFF; // in the "ds64"
+constexpr std::int64_t kSmallestContainer = 4;       // nothing but the form type
+
+std::int64_t padOf(std::int64_t size)
+{
+    return size & 1;
+}
+
+} // namespace
+
+/// The chunk behind which a new one goes.
+struct ContainerEditor::LastChunk {
+    WalkedChunk chunk;
+    std::int64_t insertion = 0;
+    std::int64_t dataSize = 0; // of the chunk "data"
+};
+
+std::int32_t ContainerEditor::append(FourCC id, BytesView body)
+{
+    return isCAF() ? appendToCAF(id, body) : appendToContainer(id, body);
+}
+
+/// At the end of the file, without a pad byte. Kept: a last chunk "data" whose size says "to the end of the file" is
+/// not closed first, so that what is put behind it becomes part of it; callers who may meet one look before.
+std::int32_t ContainerEditor::appendToCAF(FourCC id, BytesView body)
+{
+    const std::int64_t end = file_.GetEOF();
+    CAFChunkHeader header{id, static_cast<std::int64_t>(body.size())};
+    header.id.swap();
+    header.size.swap();
+    const BytesView pieces[] = {std::as_bytes(std::span(&header, 1)), body};
+    return writeTogether(end, pieces) == kStatusOK ? kAdded : kChunkHeaderFailed;
+}
+
+/// Whether the sizes can be said is known before anything is written.
+std::int32_t ContainerEditor::appendToContainer(FourCC id, BytesView body)
+{
+    FileWindow window(file_, file_.GetEOF());
+    if (ContainerKind(window) == 0)
+        return kNoChunkedContainer;
+    ContainerChkExtended header;
+    if (ReadContainerHeader(window, header) != kStatusOK)
+        return kHeaderUnreadable;
+    if (ContainerEnd(header, window.length()) < 0)
+        return kStatusEndOfFile;
+    LastChunk last;
+    if (const std::int32_t status = findLastChunk(window, header, last); status != kStatusOK)
+        return status;
+
+    const ContainerChkExtended before = header;
+    const auto size = static_cast<std::int64_t>(body.size());
+    std::int64_t containerSize = 0;
+    if (__builtin_add_overflow(last.insertion, size + padOf(size), &containerSize) ||
+        header.SetSize(containerSize) != kStatusOK)
+        return kChunkSizeTooLarge;
+    if (header.HasValidDs64() && !before.HasValidDs64()) {
+        header.dataSize = static_cast<std::uint64_t>(last.dataSize);
+        header.sampleCount = static_cast<std::uint64_t>(info_.frames);
+    }
+    ChkHeader chunk{id, {}};
+    if (chunk.SetSize(size, header) != kStatusOK)
+        return kChunkSizeTooLarge;
+
+    if (before.HasValidDs64() && !header.HasValidDs64() && storeSizesOutright(before) != kStatusOK)
+        return kHeaderNotWritten;
+    if (storeLastSize(last, header) != kStatusOK)
+        return kHeaderNotWritten;
+    chunk.ByteOrder(header);
+    if (const std::int32_t status = writeChunk(last.insertion, chunk, body, padOf(size) != 0); status != kStatusOK)
+        return status;
+    return writeContainerHeader(header) == kStatusOK ? kAdded : kHeaderNotWritten;
+}
+
+/// Kept: the container's size decides which chunk is the last, so that in a recording that was cut short, whose size is
+/// still 0, a new chunk goes over the samples; callers who may meet one look before.
+std::int32_t ContainerEditor::findLastChunk(FileWindow& window, const ContainerChkExtended& header,
+                                            LastChunk& last) const
+{
+    const std::int64_t end = ContainerEnd(header, window.length());
+    const std::int32_t status = WalkChunks(window, header, end, [&](const WalkedChunk& chunk) {
+        last.chunk = chunk;
+        last.insertion = std::min(chunk.next, window.length());
+        if (chunk.header.id == kData)
+            last.dataSize = chunk.size;
+        return true;
+    });
+    return status == kFirstChunkUnreadable ? kChunkHeaderFailed : status;
+}
+
+/// Repairs a last chunk whose size is stale.
+std::int32_t ContainerEditor::storeLastSize(LastChunk& last, ContainerChkExtended& header)
+{
+    ChkHeader& chunk = last.chunk.header;
+    const std::int64_t body = last.chunk.position + std::int64_t{sizeof(ChkHeader)};
+    std::int64_t extent = 0;
+    const bool overflows = __builtin_add_overflow(body + padOf(last.chunk.size), last.chunk.size, &extent);
+    if (!overflows && extent == last.insertion)
+        return kStatusOK;
+    chunk.SetSize(last.insertion - body, header);
+    return writeChunkHeader(last.chunk.position, chunk, header);
+}
+
+/// Pieces that follow each other in the file, in one system call when they are small.
+std::int32_t ContainerEditor::writeTogether(std::int64_t position, std::span<const BytesView> pieces)
+{
+    std::array<std::byte, 8192> together;
+    std::size_t filled = 0;
+    for (const BytesView piece : pieces) {
+        if (piece.size() > together.size() - filled)
+            return writeApart(position, pieces);
+        std::copy(piece.begin(), piece.end(), together.begin() + static_cast<std::ptrdiff_t>(filled));
+        filled += piece.size();
+    }
+    const std::int32_t status = file_.Write(together.data(), position, static_cast<long>(filled));
+    if (status == kStatusOK)
+        info_.fileLength = std::max(info_.fileLength, position + static_cast<std::int64_t>(filled));
+    return status;
+}
+
+std::int32_t ContainerEditor::writeApart(std::int64_t position, std::span<const BytesView> pieces)
+{
+    for (const BytesView piece : pieces) {
+        const auto size = static_cast<long>(piece.size());
+        if (const std::int32_t status = file_.Write(piece.data(), position, size); status != kStatusOK)
+            return status;
+        position += size;
+    }
+    info_.fileLength = std::max(info_.fileLength, position);
+    return kStatusOK;
+}
+
+/// `chunk` is in file layout. Which part could not be written is found out by writing the header once more.
+std::int32_t ContainerEditor::writeChunk(std::int64_t position, const ChkHeader& chunk, BytesView body, bool padded)
+{
+    constexpr std::byte pad{};
+    const BytesView pieces[] = {std::as_bytes(std::span(&chunk, 1)), body, BytesView(&pad, padded ? 1 : 0)};
+    if (writeTogether(position, pieces) == kStatusOK)
+        return kStatusOK;
+    const bool headerFits = file_.Write(&chunk, position, sizeof chunk) == kStatusOK;
+    return headerFits ? kChunkBodyNotWritten : kChunkHeaderFailed;
+}
+
+std::int32_t ContainerEditor::writeChunkHeader(std::int64_t position, ChkHeader chunk,
+                                               const ContainerChkExtended& header)
+{
+    chunk.ByteOrder(header);
+    return file_.Write(&chunk, position, sizeof chunk);
+}
+
+std::int32_t ContainerEditor::writeContainerHeader(ContainerChkExtended header)
+{
+    const auto size = static_cast<long>(header.StoredSize());
+    header.ByteOrder();
+    return file_.Write(&header, 0, size);
+}
+
+/// A file that stops being 64-bit loses its "ds64": the chunks whose sizes stand there get them in their own headers.
+std::int32_t ContainerEditor::storeSizesOutright(const ContainerChkExtended& header)
+{
+    FileWindow window(file_, file_.GetEOF());
+    std::int32_t status = kStatusOK;
+    WalkChunks(window, header, ContainerEnd(header, window.length()), [&](const WalkedChunk& chunk) {
+        if (chunk.header.size == kSizeElsewhere && chunk.size >= 0 && chunk.size < kSizeElsewhere) {
+            const ChkHeader outright{chunk.header.id, static_cast<std::uint32_t>(chunk.size)};
+            status = writeChunkHeader(chunk.position, outright, header);
+        }
+        return status == kStatusOK;
+    });
+    return status;
+}
+
+/// One pass finds all of them, the cuts are made together, and what stands ahead of the samples is renamed at last: the
+/// same bytes as finding and removing the last one again and again, in linear time.
+std::int32_t ContainerEditor::remove(FourCC id)
+{
+    FileWindow window(file_, file_.GetEOF());
+    ContainerChkExtended header;
+    if (ReadContainerHeader(window, header) != kStatusOK)
+        return kHeaderUnreadable;
+    std::vector<Extent> found = findAll(window, id, header);
+    if (found.empty())
+        return kStatusOK;
+    if (!file_.IsOpenForWriting())
+        return kStatusNotOpen;
+
+    const auto firstCut = std::find_if(found.begin(), found.end(), [&](const Extent& extent) {
+        return id == kFree || extent.position >= info_.dataOffset;
+    });
+    std::vector<Extent> holes(firstCut, found.end());
+    found.erase(firstCut, found.end());
+    if (isCAF() && holes.size() > 1)
+        holes.resize(1); // Kept: of a CAF file's only one is cut out
+    std::int32_t status = holes.empty() ? kStatusOK : cutOut(holes);
+    if (status == kStatusOK && !holes.empty() && !isCAF())
+        status = shrink(header, holes);
+    for (auto extent = found.rbegin(); extent != found.rend() && status == kStatusOK; ++extent)
+        status = renameToFree(extent->position, header);
+    return status;
+}
+
+/// In file order. A chunk that has not all of its bytes is not removed; of a container other than CAF, none is then.
+std::vector<ContainerEditor::Extent> ContainerEditor::findAll(FileWindow& window, FourCC id,
+                                                              const ContainerChkExtended& header) const
+{
+    std::vector<Extent> found;
+    bool isComplete = true;
+    if (isCAF()) {
+        WalkCAFChunks(window, [&](FourCC chunkId, std::int64_t position, std::int64_t size) {
+            const std::int64_t body = position + std::int64_t{sizeof(CAFChunkHeader)};
+            isComplete = size <= window.length() - body;
+            if (chunkId == id && size > 0 && isComplete)
+                found.push_back({position, body + size});
+            return isComplete;
+        });
+        return found;
+    }
+    if (ContainerKind(window) == 0)
+        return found;
+    WalkChunks(window, header, ContainerEnd(header, window.length()), [&](const WalkedChunk& chunk) {
+        if (chunk.header.id == id) {
+            found.push_back({chunk.position, chunk.next});
+            isComplete =
+                chunk.size >= 0 && chunk.size <= window.length() - chunk.position - std::int64_t{sizeof chunk.header};
+        }
+        return true;
+    });
+    if (!isComplete)
+        found.clear();
+    return found;
+}
+
+/// Closes the holes, which are in file order: what lies between them is moved down, at last the rest of the file.
+std::int32_t ContainerEditor::cutOut(const std::vector<Extent>& holes)
+{
+    std::int64_t to = holes.front().position;
+    std::int32_t status = kStatusOK;
+    std::int64_t aheadOfSamples = 0;
+    for (std::size_t i = 0; i + 1 < holes.size() && status == kStatusOK; ++i) {
+        const std::int64_t kept = holes[i + 1].position - holes[i].next;
+        status = movePiece(holes[i].next, to, kept);
+        to += kept;
+    }
+    if (status == kStatusOK)
+        status = file_.BlockMove(holes.back().next, to);
+    for (const Extent& hole : holes) {
+        if (hole.position < info_.dataOffset)
+            aheadOfSamples += hole.next - hole.position;
+    }
+    if (status == kStatusOK) {
+        info_.dataOffset -= aheadOfSamples;
+        info_.fileLength = file_.GetEOF();
+    }
+    return status;
+}
+
+/// Towards the start of the file.
+std::int32_t ContainerEditor::movePiece(std::int64_t from, std::int64_t to, std::int64_t count)
+{
+    constexpr std::int64_t largestPiece = 1048576;
+    const auto capacity = static_cast<std::size_t>(std::min(count, largestPiece));
+    const std::unique_ptr<char[]> buffer(new (std::nothrow) char[capacity]);
+    if (!buffer)
+        return kStatusOutOfMemory;
+    std::int32_t status = kStatusOK;
+    for (std::int64_t done = 0; done < count && status == kStatusOK;) {
+        const auto piece = static_cast<long>(std::min(count - done, largestPiece));
+        status = file_.Read(buffer.get(), from + done, piece, nullptr);
+        if (status == kStatusOK)
+            status = file_.Write(buffer.get(), to + done, piece);
+        done += piece;
+    }
+    return status;
+}
+
+/// Stores the container's size after a cut.
+std::int32_t ContainerEditor::shrink(ContainerChkExtended header, const std::vector<Extent>& holes)
+{
+    const ContainerChkExtended before = header;
+    std::int64_t size = header.EffectiveSize();
+    for (const Extent& hole : holes)
+        size -= hole.next - hole.position;
+    if (holes.front().position == std::int64_t{sizeof(ContainerChk)})
+        header.firstChunkId = 0; // another stands there now, which must not be taken for a reservation
+    header.SetSize(std::max(size, kSmallestContainer));
+    if (before.HasValidDs64() && !header.HasValidDs64()) {
+        if (const std::int32_t status = storeSizesOutright(before); status != kStatusOK)
+            return status;
+    }
+    return writeContainerHeader(header);
+}
+
+/// Only the id is written, unless the size stands in the "ds64" under it.
+std::int32_t ContainerEditor::renameToFree(std::int64_t position, const ContainerChkExtended& header)
+{
+    ChkHeader chunk{kFree, {}};
+    if (header.HasValidDs64()) {
+        ChkHeader stored;
+        if (const std::int32_t status = file_.Read(&stored, position, sizeof stored, nullptr); status != kStatusOK)
+            return status;
+        stored.ByteOrder(header);
+        const std::int64_t size = stored.EffectiveSize(header);
+        if (stored.size == kSizeElsewhere && size >= 0 && size < kSizeElsewhere) {
+            chunk.size = static_cast<std::uint32_t>(size);
+            return writeChunkHeader(position, chunk, header);
+        }
+    }
+    chunk.id.swap();
+    return file_.Write(&chunk.id, position, sizeof chunk.id);
+}

@@ -1,0 +1,76 @@
+// A window on the bytes of an open file: the headers of an audio file are read through it, so that those which lie
+// together cost one system call, however often they are asked for.
+#pragma once
+
+#include "files/CFileIO.h"
+#include "platform/core/Status.h"
+
+#include <algorithm>
+#include <array>
+#include <cstddef>
+#include <cstdint>
+#include <cstring>
+
+/// Keeps two pieces of the file: its start, and what was read last elsewhere, which is where the chunks behind the
+/// samples stand. Does not own the file; what is written to it meanwhile is not seen.
+class FileWindow {
+public:
+    /// `length` is that of the file, asked for once.
+    FileWindow(CFileIO& file, std::int64_t length) : file_(file), length_(length) {}
+
+    std::int64_t length() const { return length_; }
+
+    /// Copies at most `count` bytes, at most those of a piece, and returns their number; 0 on failure.
+    std::size_t readSome(void* to, std::int64_t position, std::size_t count)
+    {
+        if (position < 0 || position >= length_)
+            return 0;
+        const auto wanted =
+            static_cast<std::size_t>(std::min<std::int64_t>(static_cast<std::int64_t>(count), length_ - position));
+        if (position + static_cast<std::int64_t>(wanted) <= std::int64_t{kStartSize})
+            return start_.copy(*this, to, position, wanted, 0);
+        return elsewhere_.copy(*this, to, position, wanted, position);
+    }
+
+    /// All of the bytes; kStatusEndOfFile when they are not all there, or are more than a piece.
+    std::int32_t read(void* to, std::int64_t position, std::size_t count)
+    {
+        return readSome(to, position, count) == count ? kStatusOK : kStatusEndOfFile;
+    }
+
+private:
+    static constexpr std::size_t kStartSize = 4096; // most headers end within it, also those padded to a page
+    static constexpr std::size_t kNextSize = 2048;  // a chunk or two behind the samples
+
+    template <std::size_t Capacity>
+    struct Piece {
+        /// Reads anew from `from` on when the bytes are not all here.
+        std::size_t copy(FileWindow& window, void* to, std::int64_t position, std::size_t wanted, std::int64_t from)
+        {
+            if (position < start || position - start > std::int64_t{Capacity} ||
+                static_cast<std::size_t>(position - start) + wanted > size)
+                load(window, from);
+            const auto offset = static_cast<std::size_t>(position - start);
+            const std::size_t copied = offset < size ? std::min(wanted, size - offset) : 0;
+            std::memcpy(to, bytes.data() + offset, copied);
+            return copied;
+        }
+        void load(FileWindow& window, std::int64_t from)
+        {
+            long actual = 0;
+            const auto there = std::min<std::int64_t>(std::int64_t{Capacity}, window.length_ - from);
+            window.file_.Read(bytes.data(), from, static_cast<long>(there), &actual);
+            start = from;
+            size = static_cast<std::size_t>(std::max(actual, 0L));
+        }
+
+        std::int64_t start = 0;
+        std::size_t size = 0;
+        std::array<std::byte, Capacity> bytes; // filled up to size
+    };
+
+    CFileIO& file_;
+    std::int64_t length_;
+    Piece<kStartSize> start_;
+    Piece<kNextSize> elsewhere_;
+};

@@ -1,0 +1,361 @@
+// Adding and removing chunks, and the headers that follow the samples.
+#include "audiofile/CAudioFileIO.h"
+
+#include "support/ContainerBuilder.h"
+#include "support/FaultInjection.h"
+#include "support/TemporaryFolder.h"
+
+#include <gtest/gtest.h>
+
+#include <cstring>
+#include <random>
+
+using namespace std::string_view_literals;
+
+namespace {
+
+constexpr std::int64_t kGiB = 1LL << 30;
+
+std::int32_t add(CAudioFileIO& file, const char (&id)[5], std::string_view body, bool replace = false)
+{
+    return file.AddChunk(fourCC(id), bytesOf(body), replace);
+}
+
+ContainerBuilder wave()
+{
+    return ContainerBuilder("RIFF").format().chunk("data", "1234");
+}
+
+ContainerBuilder aiff()
+{
+    return ContainerBuilder("FORM", "AIFF").format(2).chunk("SSND", 12);
+}
+
+TEST(ChunkEdit, AnAddedChunkStandsBehindTheLast)
+{
+    const auto withBehind = [](Bytes image, std::string_view behind) {
+        for (const char c : behind)
+            image.push_back(static_cast<std::byte>(c));
+        return image;
+    };
+    struct Case {
+        const char* what;
+        Bytes before, after;
+        std::string_view body;
+    };
+    const Case cases[] = {
+        {"WAVE", wave().bytes(), wave().chunk("note", "odd").bytes(), "odd"},
+        {"AIFF", aiff().bytes(), aiff().chunk("note", "even").bytes(), "even"},
+        {"nothing", aiff().bytes(), aiff().chunk("note", "").bytes(), ""},
+        {"last size stale", wave().chunk("LIST", "abcdef", 2).bytes(),
+         wave().chunk("LIST", "abcdef").chunk("note", "x").bytes(), "x"},
+        {"file cut short", wave().bytes(4000), wave().chunk("note", "x").bytes(), "x"},
+        {"CAF", ContainerBuilder("caff").format().bytes(),
+         ContainerBuilder("caff").format().chunk("note", "odd").bytes(), "odd"},
+        {"CAF data to the end", ContainerBuilder("caff").format().chunk("data", "1234", -1).bytes(),
+         ContainerBuilder("caff").format().chunk("data", "1234", -1).chunk("note", "x").bytes(), "x"},
+        {"over what follows the container", withBehind(wave().bytes(), "behind the container"),
+         withBehind(wave().chunk("note", "12").bytes(), " container"), "12"},
+    };
+    for (const Case& each : cases) {
+        SCOPED_TRACE(each.what);
+        CAudioFileIO file;
+        openInMemory(file, each.before);
+        EXPECT_EQ(file.AddChunk(fourCC("note"), bytesOf(each.body), false), 1);
+        EXPECT_EQ(textOf(contentOf(file)), textOf(each.after));
+        EXPECT_EQ(file.Info().fileLength, file.GetEOF());
+    }
+}
+
+TEST(ChunkEdit, Remove)
+{
+    const auto ahead = [](const char* id) {
+        return ContainerBuilder("RIFF").format().chunk(id, "odd").chunk("data", "1234");
+    };
+    struct Case {
+        const char* what;
+        FourCC id;
+        Bytes before, after;
+        std::int64_t dataOffset;
+    };
+    const FourCC note = fourCC("note");
+    const Case cases[] = {
+        {"behind", note, wave().chunk("note", "odd").chunk("LIST", "x").bytes(), wave().chunk("LIST", "x").bytes(), 44},
+        {"last", note, wave().chunk("LIST", "x").chunk("note", "odd").bytes(), wave().chunk("LIST", "x").bytes(), 44},
+        {"ahead", note, ahead("note").bytes(), ahead("free").bytes(), 56},
+        {"ahead and behind", note, ahead("note").chunk("note", "").chunk("LIST", "").chunk("note", "12").bytes(),
+         ahead("free").chunk("LIST", "").bytes(), 56},
+        {"filler ahead", kFree, ahead("free").bytes(), wave().bytes(), 44},
+        {"none", note, wave().bytes(), wave().bytes(), 44},
+        {"not all there", note, wave().chunk("note", "12").chunk("note", "34", 5).bytes(),
+         wave().chunk("note", "12").chunk("note", "34", 5).bytes(), 44},
+        {"AIFF", note, aiff().chunk("note", "odd").bytes(), aiff().bytes(), 54},
+        {"the first, with nothing ahead of it", kJUNK,
+         ContainerBuilder("RIFF").chunk("JUNK", 28).chunk("LIST", "12").bytes(),
+         ContainerBuilder("RIFF").chunk("LIST", "12").bytes(), 0},
+        {"CAF", note,
+         ContainerBuilder("caff")
+             .format()
+             .chunk("note", "1")
+             .chunk("data", "abcdef")
+             .chunk("note", "2")
+             .chunk("note", "3")
+             .bytes(),
+         ContainerBuilder("caff").format().chunk("free", "1").chunk("data", "abcdef").chunk("note", "3").bytes(), 81},
+        {"no container", note, Bytes(40), Bytes(40), 0},
+    };
+    for (const Case& each : cases) {
+        SCOPED_TRACE(each.what);
+        CAudioFileIO file;
+        openInMemory(file, each.before);
+        EXPECT_EQ(file.RemoveChunk(each.id), 0);
+        EXPECT_EQ(textOf(contentOf(file)), textOf(each.after));
+        EXPECT_EQ(file.Info().dataOffset, each.dataOffset);
+    }
+}
+
+TEST(ChunkEdit, ReplacingLeavesExactlyOneAtTheEnd)
+{
+    CAudioFileIO file;
+    openInMemory(file, wave().chunk("note", "1").chunk("LIST", "x").chunk("note", "2").bytes());
+    EXPECT_EQ(add(file, "note", "3", true), 1);
+    EXPECT_EQ(textOf(contentOf(file)), textOf(wave().chunk("LIST", "x").chunk("note", "3").bytes()));
+}
+
+/// Removing as it is meant: the last one is found and cut out, until there is none.
+void removeOneByOne(CAudioFileIO& file, FourCC id)
+{
+    CChunkData chunk;
+    while (file.FindChunk(id, chunk) == 1) {
+        if (chunk.position < file.Info().dataOffset) {
+            ASSERT_EQ(file.Write("free", chunk.position, 4), 0);
+            continue;
+        }
+        ContainerChkExtended header;
+        ASSERT_EQ(file.ReadExtendedFileHeader(header), 0);
+        ASSERT_EQ(file.BlockMove(chunk.next, chunk.position), 0);
+        header.SetSize(header.EffectiveSize() - (chunk.next - chunk.position));
+        header.ByteOrder();
+        ASSERT_EQ(file.Write(&header, 0, sizeof(ContainerChk)), 0);
+    }
+}
+
+TEST(ChunkEdit, RemovingTogetherGivesTheSameBytesAsOneByOne)
+{
+    std::mt19937 random(1);
+    for (int round = 0; round < 300; ++round) {
+        ContainerBuilder builder(round % 2 == 0 ? "RIFF" : "FORM", round % 2 == 0 ? "WAVE" : "AIFF");
+        builder.format();
+        for (auto left = random() % 12; left > 0; --left) {
+            const char* const ids[] = {"note", "note", "LIST", round % 2 == 0 ? "data" : "SSND"};
+            builder.chunk(ids[random() % 4], std::string(8 + random() % 5, 'x'));
+        }
+        CAudioFileIO together, oneByOne;
+        openInMemory(together, builder.bytes());
+        openInMemory(oneByOne, builder.bytes());
+        EXPECT_EQ(together.RemoveChunk(fourCC("note")), 0);
+        removeOneByOne(oneByOne, fourCC("note"));
+        ASSERT_EQ(textOf(contentOf(together)), textOf(contentOf(oneByOne)));
+    }
+}
+
+TEST(ChunkEdit, ManyOfAnIdAreRemovedInLinearTime)
+{
+    constexpr int count = 50000;
+    ContainerBuilder builder = wave();
+    for (int i = 0; i < count; ++i)
+        builder.chunk("note", "1").chunk("LIST", "2");
+    const TemporaryFolder folder;
+    CAudioFileIO file(CFileRef(folder.write("many.wav", builder.bytes()).c_str(), false), kFileIOReadWrite);
+    FaultInjector faults;
+    EXPECT_EQ(file.RemoveChunk(fourCC("note")), 0);
+    EXPECT_LE(faults.calls(Call::pread) + faults.calls(Call::pwrite), 3 * count);
+    EXPECT_EQ(faults.calls(Call::ftruncate), 1);
+    EXPECT_EQ(file.FindChunk(fourCC("note")), std::nullopt);
+    int lists = 0;
+    file.ForEachChunk([&](const ChunkEntry& chunk) { return lists += chunk.id == fourCC("LIST"), true; });
+    EXPECT_EQ(lists, count);
+}
+
+/// A file that is all holes behind what is given.
+std::string sparseFile(const TemporaryFolder& folder, const Bytes& start, std::int64_t length)
+{
+    const std::string path = folder.write("sparse.wav", start);
+    std::filesystem::resize_file(path, static_cast<std::uintmax_t>(length));
+    return path;
+}
+
+TEST(ChunkEdit, BecomesRF64AndRIFFAgain)
+{
+    constexpr std::int64_t dataSize = 4 * kGiB - 100;
+    const TemporaryFolder folder;
+    const Bytes start = ContainerBuilder("RIFF")
+                            .chunk("JUNK", std::string(28, '?'))
+                            .format()
+                            .chunk("data", "", dataSize)
+                            .bytes(4 * kGiB - 28);
+    const std::string path = sparseFile(folder, start, dataSize + std::int64_t(start.size()));
+    {
+        CAudioFileIO file(CFileRef(path.c_str(), false), kFileIOReadWrite);
+        EXPECT_EQ(add(file, "note", "beyond the limit of 32 bits"), 1);
+        ContainerChkExtended header;
+        ASSERT_EQ(file.ReadExtendedFileHeader(header), 0);
+        EXPECT_TRUE(header.id == kRF64 && header.HasValidDs64() && header.size == 0xFFFFFFFF);
+        EXPECT_EQ(header.EffectiveSize(), file.GetEOF() - 8);
+        EXPECT_EQ(header.dataSize, dataSize); // other readers look here whatever the chunk says
+        EXPECT_EQ(header.sampleCount, dataSize / 2);
+        EXPECT_EQ(header.tableLength, 0u);
+    }
+    CAudioFileIO file(CFileRef(path.c_str(), false), kFileIOReadWrite);
+    EXPECT_EQ(file.Info().dataSize, dataSize);
+    EXPECT_EQ(textOf(file.FindChunk(fourCC("note")).value_or(Bytes())), "beyond the limit of 32 bits");
+    EXPECT_EQ(file.RemoveChunk(fourCC("note")), 0);
+    ContainerChkExtended header;
+    ASSERT_EQ(file.ReadExtendedFileHeader(header), 0);
+    EXPECT_TRUE(header.id == kRIFF && header.HasJunkReservation());
+    EXPECT_EQ(header.size, file.GetEOF() - 8);
+    EXPECT_EQ(file.GetEOF(), dataSize + std::int64_t(start.size()));
+}
+
+TEST(ChunkEdit, AFileThatStopsBeing64BitKeepsItsSizes)
+{
+    // Most writers of RF64 put every size into the "ds64", however small.
+    const auto image = [](const char* container) {
+        return ContainerBuilder(container)
+            .ds64(12 + 60 + 24 + 12 + 12, 4, {{fourCC("levl"), 4}})
+            .format()
+            .chunk("data", "1234", 0xFFFFFFFF)
+            .chunk("levl", "abcd", 0xFFFFFFFF);
+    };
+    for (const char* container : {"RF64", "BW64"}) {
+        CAudioFileIO file;
+        openInMemory(file, image(container).chunk("note", "12").bytes(0xFFFFFFFF));
+        EXPECT_EQ(add(file, "note", "34", true), 1);
+        EXPECT_EQ(listing(file), "JUNK:40 fmt :16 data:4 levl:4 note:2");
+        CAudioFileIO again;
+        openInMemory(again, contentOf(file));
+        EXPECT_EQ(again.Info().containerId, kRIFF);
+        EXPECT_EQ(again.Info().frames, 2);
+    }
+    CAudioFileIO file;
+    openInMemory(file, image("RF64").bytes(0xFFFFFFFF));
+    EXPECT_EQ(file.RemoveChunk(kData), 0); // samples are not moved: their chunk is neutralised
+    EXPECT_EQ(listing(file), "ds64:40 fmt :16 free:4 levl:4");
+}
+
+const platform::SystemCalls* realCalls = nullptr;
+
+/// Bodies of gigabytes are not written, the file only gets as long.
+std::int64_t writeWithHoles(int descriptor, const void* bytes, std::size_t count, std::int64_t offset)
+{
+    if (count < kGiB)
+        return realCalls->pwrite(descriptor, bytes, count, offset);
+    const auto end = offset + static_cast<std::int64_t>(count);
+    return realCalls->ftruncate(descriptor, end) == 0 ? static_cast<std::int64_t>(count) : -1;
+}
+
+TEST(ChunkEdit, AChunkOf4GiBNeedsRoomInTheTable)
+{
+    const SystemCallGuard guard;
+    realCalls = &guard.real();
+    platform::systemCalls().pwrite = writeWithHoles;
+    const std::unique_ptr<char[]> huge(new char[5 * kGiB]); // not touched
+    const TemporaryFolder folder;
+    for (const bool hasRoom : {true, false}) {
+        ContainerBuilder builder("RF64");
+        builder.chunk("ds64", hasRoom ? 40 : 28).format().chunk("data", "1234");
+        const CFileRef ref(folder.write("a.wav", builder.bytes()).c_str(), false);
+        CAudioFileIO file(ref, kFileIOReadWrite);
+        const long long before = file.GetEOF();
+        EXPECT_EQ(file.AddChunk(fourCC("levl"), huge.get(), 5 * kGiB, false), hasRoom ? 1 : -9);
+        EXPECT_EQ(file.GetEOF(), hasRoom ? before + 8 + 5 * kGiB : before);
+        EXPECT_EQ(listing(file), hasRoom ? "ds64:40 fmt :16 data:4 levl:5368709120" : "ds64:28 fmt :16 data:4");
+    }
+    CAudioFileIO file(CFileRef(folder.write("b.wav", wave().bytes()).c_str(), false), kFileIOReadWrite);
+    EXPECT_EQ(file.AddChunk(fourCC("levl"), huge.get(), 5 * kGiB, false), -9); // no reservation
+    EXPECT_EQ(readFile(folder.path() / "b.wav"), wave().bytes());
+}
+
+TEST(ChunkEdit, FailuresSayWhatWasNotWritten)
+{
+    const TemporaryFolder folder;
+    const auto open = [&](CAudioFileIO& file, const Bytes& content) {
+        return file.Open(CFileRef(folder.write("a", content).c_str(), false), kFileIOReadWrite);
+    };
+    struct Case {
+        const char* what;
+        Bytes content;
+        int write; // which one fails
+        int times; // and how many from there on
+        std::int32_t result;
+    };
+    const Bytes stale = wave().chunk("LIST", "abcdef", 2).bytes();
+    const Bytes caf = ContainerBuilder("caff").format().bytes();
+    const Case cases[] = {
+        {"chunk header", wave().bytes(), 1, 2, -3},
+        {"body", wave().bytes(), 1, 1, -4}, // its header, tried alone, can be written
+        {"container", wave().bytes(), 2, 1, -5},
+        {"last chunk", stale, 1, 1, -5},
+        {"CAF", caf, 1, 1, -3},
+        {"renaming", ContainerBuilder("RIFF").format().chunk("note", "1").chunk("data", "1234").bytes(), 1, 1, -7},
+    };
+    for (const Case& each : cases) {
+        SCOPED_TRACE(each.what);
+        CAudioFileIO file;
+        open(file, each.content);
+        FaultInjector faults;
+        faults.fail(Call::pwrite, ENOSPC, each.write, each.times);
+        EXPECT_EQ(add(file, "note", "odd", true), each.result);
+    }
+    CAudioFileIO file;
+    EXPECT_EQ(add(file, "note", "x"), -6);
+    open(file, Bytes(40));
+    EXPECT_EQ(add(file, "note", "x"), 0);
+    EXPECT_EQ(file.AddChunk(fourCC("note"), nullptr, 1, false), kStatusParameterError);
+    EXPECT_EQ(file.AddChunk(fourCC("note"), nullptr, -1, false), kStatusParameterError);
+    open(file, Bytes(4));
+    EXPECT_EQ(file.RemoveChunk(kData), -2);
+    open(file, ContainerBuilder("FORM", "AIFF").chunk("COMM", "").bytes(0x80000000));
+    EXPECT_EQ(add(file, "note", "x"), kStatusEndOfFile); // a negative size ends ahead of the file
+    file.Open(CFileRef(folder.write("b", wave().chunk("note", "").bytes()).c_str(), false), 0);
+    EXPECT_EQ(add(file, "note", "x"), -6);
+    EXPECT_EQ(file.RemoveChunk(fourCC("note")), kStatusNotOpen);
+}
+
+TEST(ChunkEdit, TheHeaderFollowsTheSamples)
+{
+    const TemporaryFolder folder;
+    const CFileRef ref((folder / "new").c_str(), false);
+    const float samples[] = {0, 0.5, -0.5};
+    for (const FourCC type : {kWAVE, kAIFF, kCaff}) {
+        SCOPED_TRACE(fourCCText(type));
+        CAudioFileIO file;
+        ASSERT_EQ(file.CreateAndOpenCommon(ref, 100, kAudioBusMono, 0, 8, 44100, type, true), kStatusOK);
+        EXPECT_EQ(file.CacheBlock()->size(), 102400u);
+        EXPECT_EQ(file.Info().frames, 0);
+        EXPECT_EQ(file.WriteFrames(samples, 0, 3), kStatusOK);
+        EXPECT_EQ(add(file, "note", "x"), 1); // behind samples that the header on disk does not count yet
+        EXPECT_EQ(file.Close(), kStatusOK);
+        ASSERT_EQ(file.Open(ref, kFileIOReadWrite), kStatusOK);
+        EXPECT_EQ(file.Info().frames, 3);
+        EXPECT_EQ(file.FindChunk(fourCC("note")), Bytes(1, std::byte{'x'}));
+        const std::int64_t dataOffset = file.Info().dataOffset;
+        EXPECT_EQ(file.SetNumFrames(2), kStatusOK);
+        EXPECT_EQ(file.Info().dataOffset, dataOffset); // the reservation is still there, the samples where they were
+        EXPECT_EQ(file.GetEOF(), dataOffset + 2);
+        EXPECT_EQ(file.SetNumFrames(-1), kStatusParameterError);
+    }
+    CAudioFileIO file;
+    ASSERT_EQ(file.CreateAndOpenCommon(ref, 0, kAudioBusMono, 0, 8, 44100, kWAVE, false), kStatusOK);
+    file.WriteFrames(samples, 0, 3);
+    EXPECT_EQ(file.UpdateHeader(), kStatusOK);
+    EXPECT_EQ(file.GetEOF(), 48); // 44 and 3, padded
+    EXPECT_EQ(file.CreateAndOpenCommon(ref, 0, kAudioBusMono, 0, 7, 44100, kWAVE, false), kStatusParameterError);
+    EXPECT_EQ(readFile(folder / "new").size(), 48u); // which left the file alone
+    CAudioFileIO other;
+    openInMemory(other, Bytes(100));
+    EXPECT_EQ(other.SetNumFrames(0), kStatusParameterError); // no header to build: nothing is cut off
+    EXPECT_EQ(other.GetEOF(), 100);
+}
+
+} // namespace

@@ -1,0 +1,95 @@
+#include "loops/FileInfoChunkAccess.h"
+
+#include "loops/VireoLoopBaseChunk.h"
+#include "loops/VireoLoopFileInfoChunkDataTypes.h"
+#include "loops/VireoLoopUserDataUtils.h"
+#include "platform/KeyedArchive.h"
+#include "platform/String.h"
+#include "platform/core/Status.h"
+
+using Types = VireoLoopFileInfoChunkDataTypes;
+using UserData = VireoLoopUserDataUtils;
+using platform::Dictionary;
+
+namespace {
+
+constexpr const char* kKeys[] = {VireoLoopFileInfoChunkDataTitleKey, VireoLoopFileInfoChunkDataArtistKey,
+                                 VireoLoopFileInfoChunkDataCopyrightKey, VireoLoopFileInfoChunkDataCommentsKey};
+
+/// The text of an AIFF text chunk: to its first NUL; none when it is not UTF-8.
+std::optional<std::string> textIn(std::string_view key, BytesView data)
+{
+    if (key == VireoLoopFileInfoChunkDataCommentsKey)
+        return Types::commentStringFromAifCommentChunkData(data);
+    const std::string_view text = textOf(data);
+    const auto valid = platform::String::fromUTF8(text.substr(0, text.find('\0')));
+    return valid ? std::optional(valid.utf8()) : std::nullopt;
+}
+
+} // namespace
+
+void FileInfoCafChunkReader::readChunk()
+{
+    Dictionary information;
+    if (file_.information(information) != kStatusOK)
+        return;
+    // The data object takes what it knows from the archive and leaves the rest.
+    if (const auto archive = platform::archiveDictionary(information))
+        chunk_.chunkData().setChunkData(*archive, fourCC("caff"));
+}
+
+bool FileInfoCafChunkWriter::writeChunk()
+{
+    const auto archive = chunk_.chunkData().chunkDataForAudioFileType(fourCC("caff"));
+    Dictionary information;
+    if (!archive || file_.information(information) != kStatusOK)
+        return false;
+    const Dictionary info = Types::fileInfoChunkDataDictionaryFromCafChunkData(*archive);
+    return file_.setInformation(Types::cafFileInfoPropertyForMergingChunkDataDict(info, information)) == kStatusOK;
+}
+
+bool FileInfoCafChunkRemover::removeChunk()
+{
+    Dictionary information;
+    if (file_.information(information) != kStatusOK)
+        return false;
+    const std::size_t before = information.size();
+    for (const auto& [key, empty] : Types::cafFileInfoPropertyForMergingChunkDataDict({}, {}))
+        information.erase(key);
+    return information.size() == before || file_.setInformation(information) == kStatusOK;
+}
+
+void FileInfoAifChunkReader::readChunk()
+{
+    Dictionary texts;
+    for (const char* key : kKeys) {
+        const auto data = UserData::read(file_, Types::fileInfoTypeForKey(key), 0);
+        if (auto text = data ? textIn(key, *data) : std::nullopt)
+            texts[Types::fileInfoKeyForKey(key)] = std::move(*text);
+    }
+    if (texts.empty())
+        return;
+    if (const auto archive = platform::archiveDictionary(texts))
+        chunk_.chunkData().setChunkData(*archive, fourCC("AIFF"));
+}
+
+bool FileInfoAifChunkWriter::writeChunk()
+{
+    const auto archive = chunk_.chunkData().chunkDataForAudioFileType(fourCC("AIFF"));
+    if (!archive)
+        return false;
+    for (const char* key : kKeys) {
+        const auto part = Types::aifChunkDataPartFromAifChunkData(*archive, key);
+        if (part && !UserData::write(file_, Types::fileInfoTypeForKey(key), 0, *part))
+            return false;
+    }
+    return true;
+}
+
+bool FileInfoAifChunkRemover::removeChunk()
+{
+    bool gone = true;
+    for (const char* key : kKeys)
+        gone = UserData::removeAll(file_, Types::fileInfoTypeForKey(key)) && gone;
+    return gone;
+}

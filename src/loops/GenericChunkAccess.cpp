@@ -1,0 +1,51 @@
+#include "loops/GenericChunkAccess.h"
+
+#include "loops/VireoLoopBaseChunk.h"
+#include "loops/VireoLoopUserDataUtils.h"
+
+using UserData = VireoLoopUserDataUtils;
+using UUIDUserData = VireoLoopUUIDUserDataUtils;
+
+void GenericCafChunkReader::readChunk()
+{
+    const auto data = chunk_.cafChunkIsUUIDChunk() ? UUIDUserData::read(file_, *chunk_.cafChunkUUID())
+                                                   : UserData::read(file_, chunk_.cafChunkID(), 0);
+    if (data)
+        chunk_.chunkData().setChunkData(*data, fourCC("caff"));
+}
+
+bool GenericCafChunkWriter::writeChunk()
+{
+    const auto data = chunk_.chunkData().chunkDataForAudioFileType(fourCC("caff"));
+    if (!data)
+        return false;
+    return chunk_.cafChunkIsUUIDChunk() ? UUIDUserData::write(file_, *chunk_.cafChunkUUID(), *data)
+                                        : UserData::write(file_, chunk_.cafChunkID(), 0, *data);
+}
+
+bool GenericCafChunkRemover::removeChunk()
+{
+    return chunk_.cafChunkIsUUIDChunk() ? UUIDUserData::removeAll(file_, *chunk_.cafChunkUUID())
+                                        : UserData::removeAll(file_, chunk_.cafChunkID());
+}
+
+void GenericAifChunkReader::readChunk()
+{
+    if (chunk_.aifChunkID() == 0)
+        return;
+    if (const auto data = UserData::read(file_, chunk_.aifChunkID(), 0))
+        chunk_.chunkData().setChunkData(*data, fourCC("AIFF"));
+}
+
+bool GenericAifChunkWriter::writeChunk()
+{
+    if (chunk_.aifChunkID() == 0)
+        return true; // a chunk of CAF files only
+    const auto data = chunk_.chunkData().chunkDataForAudioFileType(fourCC("AIFF"));
+    return data && UserData::write(file_, chunk_.aifChunkID(), 0, *data);
+}
+
+bool GenericAifChunkRemover::removeChunk()
+{
+    return chunk_.aifChunkID() == 0 || UserData::removeAll(file_, chunk_.aifChunkID());
+}

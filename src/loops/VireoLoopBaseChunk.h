@@ -1,0 +1,47 @@
+// VireoLoopBaseChunk: one kind of loop chunk. It knows how AIFF and CAF name the chunk, owns its data object, and hands
+// out what reads, writes and removes it in a file of either kind. The derived classes are the suite's kinds.
+#pragma once
+
+#include "loops/ChunkAccess.h"
+#include "loops/VireoLoopChunkData.h"
+#include "loops/tagging/ChunkIDs.h"
+
+#include <memory>
+#include <optional>
+
+class KT_EXPORT VireoLoopBaseChunk {
+public:
+    /// What is not given follows from the AIFF id: the CAF type and UUID that carry it. Without a data object, an empty
+    /// VireoLoopGenericChunkData.
+    explicit VireoLoopBaseChunk(std::optional<FourCC> aifChunkID = {}, std::optional<FourCC> cafChunkID = {},
+                                const tagging::UUIDBytes* cafChunkUUID = nullptr,
+                                std::unique_ptr<VireoLoopChunkData> chunkData = nullptr);
+    virtual ~VireoLoopBaseChunk();
+    VireoLoopBaseChunk(const VireoLoopBaseChunk&) = delete;
+    VireoLoopBaseChunk& operator=(const VireoLoopBaseChunk&) = delete;
+
+    FourCC aifChunkID() const { return aifChunkID_; } // 0: none
+    FourCC cafChunkID() const { return cafChunkID_; }
+    const tagging::UUIDBytes* cafChunkUUID() const { return cafChunkUUID_; } // null: none
+    bool cafChunkIsUUIDChunk() const { return cafChunkUUID_ != nullptr; }
+    VireoLoopChunkData& chunkData() { return *chunkData_; }
+    const VireoLoopChunkData& chunkData() const { return *chunkData_; }
+
+    virtual std::unique_ptr<ChunkReader> cafChunkReader(platform::AudioFile& file);
+    virtual std::unique_ptr<ChunkReader> aifChunkReader(platform::AudioFile& file);
+    virtual std::unique_ptr<ChunkWriter> cafChunkWriter(platform::AudioFile& file);
+    virtual std::unique_ptr<ChunkWriter> aifChunkWriter(platform::AudioFile& file);
+    virtual std::unique_ptr<ChunkRemover> cafChunkRemover(platform::AudioFile& file);
+    virtual std::unique_ptr<ChunkRemover> aifChunkRemover(platform::AudioFile& file);
+
+    /// By file type, "caff" or "AIFF"; null for any other.
+    std::unique_ptr<ChunkReader> chunkReader(platform::AudioFile& file, FourCC fileType);
+    std::unique_ptr<ChunkWriter> chunkWriter(platform::AudioFile& file, FourCC fileType);
+    std::unique_ptr<ChunkRemover> chunkRemover(platform::AudioFile& file, FourCC fileType);
+
+private:
+    FourCC aifChunkID_;
+    FourCC cafChunkID_;
+    const tagging::UUIDBytes* cafChunkUUID_;
+    std::unique_ptr<VireoLoopChunkData> chunkData_;
+};

@@ -1,0 +1,39 @@
+// VireoLoopChunksManager opens one file and applies a list of loop chunks to it: reads, writes or removes them all.
+#pragma once
+
+#include "loops/VireoLoopChunks.h"
+#include "platform/AudioFileService.h"
+#include "platform/URL.h"
+
+#include <memory>
+#include <span>
+
+/// Does nothing when the file could not be opened, and for files that are neither AIFF nor CAF. Owns the open file.
+class KT_EXPORT VireoLoopChunksManager {
+public:
+    using Chunks = std::span<const std::unique_ptr<VireoLoopBaseChunk>>;
+
+    /// Opens an existing file, by default for reading and writing; what only reads may ask for less.
+    explicit VireoLoopChunksManager(platform::URLRef fileURL, platform::AudioFile::Permission permission =
+                                                                  platform::AudioFile::Permission::readWrite);
+
+    /// The status of opening: 0, or why the manager does nothing.
+    std::int32_t status() const { return status_; }
+    const platform::URLRef& fileURL() const { return fileURL_; }
+    /// "AIFF", "AIFC", "WAVE" or "caff"; 0 until it is known.
+    FourCC audioFileTypeID() const { return audioFileTypeID_; }
+    /// The open file, null when there is none; owned by the manager.
+    platform::AudioFile* audioFile() { return file_.get(); }
+
+    /// Fills the data objects of the chunks that the file has; others stay as they are.
+    void readChunks(Chunks chunks);
+    /// Empty chunks are skipped, not removed. False when one could not be written; the others still are.
+    bool writeChunks(Chunks chunks);
+    bool removeChunks(Chunks chunks);
+
+private:
+    platform::URLRef fileURL_;
+    FourCC audioFileTypeID_ = 0;
+    std::int32_t status_ = 0;
+    std::unique_ptr<platform::AudioFile> file_;
+};

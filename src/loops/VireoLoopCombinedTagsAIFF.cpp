@@ -1,0 +1,201 @@
+// The AIFF side of the combined tags: "basc" and "cate" in one archive.
+#include "loops/VireoLoopCombinedTagsChunkDataTypes.h"
+#include "loops/tagging/Chunks.h"
+#include "platform/KeyedArchive.h"
+#include "platform/String.h"
+
+#include <algorithm>
+#include <cstring>
+#include <limits>
+
+using platform::Dictionary;
+using tagging::BasicTaggingChunk;
+using tagging::CategoryChunk;
+using tagging::CategoryText;
+using tagging::kCategoryTextSize;
+
+namespace {
+
+std::int64_t numberFor(const Dictionary& tags, const char* key)
+{
+    const auto* number = platform::find<std::int64_t>(tags, key);
+    return number != nullptr ? *number : 0;
+}
+
+std::string textFor(const Dictionary& tags, const char* key)
+{
+    const auto* text = platform::find<std::string>(tags, key);
+    return text != nullptr ? *text : std::string();
+}
+
+/// The text of a 50-byte field: up to its first NUL.
+std::string_view fieldText(const std::byte* field)
+{
+    const auto* text = reinterpret_cast<const char*>(field);
+    return {text, strnlen(text, kCategoryTextSize)};
+}
+
+/// A field's text, or the empty string when it is not UTF-8. A writer that cut a long text in the midst of a character
+/// leaves an incomplete one at the end, which is dropped.
+std::string fieldTextOrNothing(const std::byte* field)
+{
+    std::string_view text = fieldText(field);
+    for (int dropped = 0; dropped < 4; ++dropped) {
+        if (const auto valid = platform::String::fromUTF8(text))
+            return valid.utf8();
+        if (text.size() < kCategoryTextSize - 4)
+            break;
+        text.remove_suffix(1);
+    }
+    return {};
+}
+
+/// `text`, cut at 49 bytes, NULs behind it.
+CategoryText field(std::string_view text)
+{
+    CategoryText to{};
+    std::copy_n(text.data(), std::min(text.size(), kCategoryTextSize - 1), to.data());
+    return to;
+}
+
+void readBasicTagging(BytesView bytes, Dictionary& tags)
+{
+    if (bytes.size() < sizeof(BasicTaggingChunk))
+        return;
+    BasicTaggingChunk basic;
+    std::memcpy(&basic, bytes.data(), sizeof basic);
+    tagging::SwapBasicTaggingChunkToHost(&basic);
+    tags[VireoLoopCombinedTagsChunkDataBeatCountKey] = std::int32_t{basic.beatCount};
+    tags[VireoLoopCombinedTagsChunkDataMidiRootNoteKey] = std::int16_t{basic.midiRootNote};
+    tags[VireoLoopCombinedTagsChunkDataKeyType] = std::int16_t{basic.keyType};
+    tags[VireoLoopCombinedTagsChunkDataSignatureTopKey] = std::int16_t{basic.signatureTop};
+    tags[VireoLoopCombinedTagsChunkDataSignatureBottomKey] = std::int16_t{basic.signatureBottom};
+    tags[VireoLoopCombinedTagsChunkDataFileTypeKey] = std::int16_t{basic.fileType};
+}
+
+/// The descriptors that the bytes hold, at most `claimed`; one that is not UTF-8 is skipped.
+platform::Array descriptorsIn(BytesView bytes, std::size_t claimed)
+{
+    std::vector<std::string> texts;
+    for (std::size_t i = 0; i < std::min(claimed, bytes.size() / kCategoryTextSize); ++i)
+        if (const auto text = platform::String::fromUTF8(fieldText(bytes.data() + i * kCategoryTextSize)))
+            texts.push_back(text.utf8());
+    std::sort(texts.begin(), texts.end());
+    texts.erase(std::unique(texts.begin(), texts.end()), texts.end());
+    return {texts.begin(), texts.end()};
+}
+
+void readCategories(BytesView bytes, Dictionary& tags)
+{
+    if (bytes.size() < sizeof(CategoryChunk))
+        return;
+    std::size_t countOffset = offsetof(CategoryChunk, descriptorCount);
+    std::size_t descriptorsOffset = sizeof(CategoryChunk);
+    switch (loadBE<std::uint32_t>(bytes.data())) {
+    case 1:
+        break;
+    case 2:
+        countOffset = tagging::kCategoryV2CountOffset;
+        descriptorsOffset = tagging::kCategoryV2DescriptorsOffset;
+        break;
+    default:
+        return;
+    }
+    const std::pair<const char*, std::size_t> texts[] = {
+        {VireoLoopCombinedTagsChunkDataInstrumentTypeKey, offsetof(CategoryChunk, instrumentType)},
+        {VireoLoopCombinedTagsChunkDataInstrumentSubTypeKey, offsetof(CategoryChunk, instrumentSubType)},
+        {VireoLoopCombinedTagsChunkDataGenreKey, offsetof(CategoryChunk, genre)},
+    };
+    for (const auto& [key, offset] : texts)
+        if (std::string text = fieldTextOrNothing(bytes.data() + offset); !text.empty())
+            tags[key] = std::move(text);
+    if (bytes.size() < descriptorsOffset)
+        return;
+    if (const auto count = loadBE<std::uint16_t>(bytes.data() + countOffset); count != 0)
+        tags[VireoLoopCombinedTagsChunkDataDescriptorsKey] = descriptorsIn(bytes.subspan(descriptorsOffset), count);
+}
+
+BasicTaggingChunk basicTaggingOf(const Dictionary& tags)
+{
+    const auto number16 = [&](const char* key) { return static_cast<std::int16_t>(numberFor(tags, key)); };
+    BasicTaggingChunk basic;
+    basic.beatCount = static_cast<std::int32_t>(numberFor(tags, VireoLoopCombinedTagsChunkDataBeatCountKey));
+    basic.midiRootNote = number16(VireoLoopCombinedTagsChunkDataMidiRootNoteKey);
+    basic.keyType = number16(VireoLoopCombinedTagsChunkDataKeyType);
+    basic.signatureTop = number16(VireoLoopCombinedTagsChunkDataSignatureTopKey);
+    basic.signatureBottom = number16(VireoLoopCombinedTagsChunkDataSignatureBottomKey);
+    basic.fileType = number16(VireoLoopCombinedTagsChunkDataFileTypeKey);
+    tagging::SwapBasicTaggingChunkToBig(&basic);
+    return basic;
+}
+
+Bytes categoriesOf(const Dictionary& tags)
+{
+    std::vector<CategoryText> descriptors;
+    if (const auto* array = platform::find<platform::Array>(tags, VireoLoopCombinedTagsChunkDataDescriptorsKey))
+        for (const platform::Value& value : *array)
+            if (const auto* text = value.get<std::string>())
+                descriptors.push_back(field(*text));
+    descriptors.resize(std::min<std::size_t>(descriptors.size(), std::numeric_limits<std::uint16_t>::max()));
+
+    CategoryChunk head;
+    head.instrumentType = field(textFor(tags, VireoLoopCombinedTagsChunkDataInstrumentTypeKey));
+    head.instrumentSubType = field(textFor(tags, VireoLoopCombinedTagsChunkDataInstrumentSubTypeKey));
+    head.genre = field(textFor(tags, VireoLoopCombinedTagsChunkDataGenreKey));
+    head.descriptorCount = static_cast<std::uint16_t>(descriptors.size());
+    tagging::SwapCategoryChunkToBig(&head);
+    const BytesView headBytes = std::as_bytes(std::span(&head, 1));
+    const BytesView descriptorBytes = std::as_bytes(std::span(descriptors));
+    Bytes bytes(headBytes.begin(), headBytes.end());
+    bytes.insert(bytes.end(), descriptorBytes.begin(), descriptorBytes.end());
+    return bytes;
+}
+
+Bytes archiveEntry(BytesView archive, const char* key)
+{
+    auto dictionary = platform::unarchiveDictionary(archive);
+    const auto found = dictionary ? dictionary->find(key) : Dictionary::iterator();
+    Bytes* bytes = dictionary && found != dictionary->end() ? found->second.get<Bytes>() : nullptr;
+    return bytes != nullptr ? std::move(*bytes) : Bytes();
+}
+
+} // namespace
+
+std::optional<Dictionary>
+VireoLoopCombinedTagsChunkDataTypes::combinedTagsChunkDataDictionaryFromAifChunkData(BytesView archive)
+{
+    if (archive.empty())
+        return std::nullopt;
+    Dictionary tags;
+    readBasicTagging(basicTaggingDataFromCombinedAidChunkData(archive), tags);
+    readCategories(categoryDataFromCombinedAidChunkData(archive), tags);
+    return tags;
+}
+
+std::optional<Bytes>
+VireoLoopCombinedTagsChunkDataTypes::aifChunkDataFromCombinedTagsChunkDataDictionary(const Dictionary& tags)
+{
+    const BasicTaggingChunk basic = basicTaggingOf(tags);
+    return combinedAifChunkDataFrom(std::as_bytes(std::span(&basic, 1)), categoriesOf(tags));
+}
+
+std::optional<Bytes> VireoLoopCombinedTagsChunkDataTypes::combinedAifChunkDataFrom(BytesView basicTaggingData,
+                                                                                   BytesView categoryData)
+{
+    Dictionary parts;
+    if (!basicTaggingData.empty())
+        parts[VireoLoopCombinedBasicTaggingDataKey] = Bytes(basicTaggingData.begin(), basicTaggingData.end());
+    if (!categoryData.empty())
+        parts[VireoLoopCombinedCategoryDataKey] = Bytes(categoryData.begin(), categoryData.end());
+    return platform::archiveDictionary(parts);
+}
+
+Bytes VireoLoopCombinedTagsChunkDataTypes::basicTaggingDataFromCombinedAidChunkData(BytesView archive)
+{
+    return archiveEntry(archive, VireoLoopCombinedBasicTaggingDataKey);
+}
+
+Bytes VireoLoopCombinedTagsChunkDataTypes::categoryDataFromCombinedAidChunkData(BytesView archive)
+{
+    return archiveEntry(archive, VireoLoopCombinedCategoryDataKey);
+}

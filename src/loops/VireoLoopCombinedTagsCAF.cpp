@@ -1,0 +1,188 @@
+// The CAF side of the combined tags: pairs of texts.
+#include "loops/VireoLoopCombinedTagsChunkDataTypes.h"
+#include "loops/tagging/CAFPayloads.h"
+#include "platform/String.h"
+#include "platform/core/ByteReader.h"
+
+#include <algorithm>
+#include <charconv>
+#include <cstring>
+#include <set>
+
+using platform::Dictionary;
+using SearchInfo = VireoLoopCombinedTagsChunkDataTypes::SearchInfo;
+
+namespace {
+
+constexpr std::int64_t kLowestNamedNote = 48;
+// Kept: this mix of flats and sharps is the vocabulary.
+constexpr const char* kNoteNames[] = {"C", "Db", "D", "D#", "E", "F", "F#", "G", "G#", "A", "A#", "B"};
+constexpr const char* kKeyTypeNames[] = {"any", "minor", "major", "neither", "both"};
+
+std::vector<std::string> split(std::string_view text, char separator)
+{
+    std::vector<std::string> parts;
+    for (;;) {
+        const std::size_t end = text.find(separator);
+        parts.emplace_back(text.substr(0, end));
+        if (end == std::string_view::npos)
+            return parts;
+        text.remove_prefix(end + 1);
+    }
+}
+
+/// The first element under a key; null when there is none.
+const std::string* firstOf(const SearchInfo& info, const char* key)
+{
+    const auto found = info.find(key);
+    return found == info.end() ? nullptr : &found->second.front();
+}
+
+/// The number that a text begins with; 0 when it begins with none, the nearest 32-bit number when it is larger.
+std::int64_t integerValue(std::string_view text)
+{
+    text.remove_prefix(std::min(text.find_first_not_of(" \t"), text.size()));
+    if (text.starts_with('+'))
+        text.remove_prefix(1);
+    std::int32_t number = 0;
+    const auto result = std::from_chars(text.data(), text.data() + text.size(), number);
+    if (result.ec == std::errc::result_out_of_range)
+        return text.starts_with('-') ? INT32_MIN : INT32_MAX;
+    return number;
+}
+
+/// Top and bottom of a signature such as "6/8"; zeros when it is none.
+std::pair<std::int64_t, std::int64_t> signatureIn(const SearchInfo& info)
+{
+    const std::string* text = firstOf(info, "time signature");
+    if (text == nullptr || text->size() < 3)
+        return {0, 0};
+    const auto parts = split(*text, '/');
+    if (parts.size() != 2)
+        return {0, 0};
+    return {integerValue(parts[0]), integerValue(parts[1])};
+}
+
+std::int64_t numberFor(const Dictionary& tags, const char* key)
+{
+    const auto* number = platform::find<std::int64_t>(tags, key);
+    return number != nullptr ? *number : 0;
+}
+
+void addKey(const Dictionary& tags, tagging::StringPairs& strings)
+{
+    const std::int64_t note = numberFor(tags, VireoLoopCombinedTagsChunkDataMidiRootNoteKey) - kLowestNamedNote;
+    if (note < 0 || note >= std::ssize(kNoteNames))
+        return;
+    const std::int64_t type = numberFor(tags, VireoLoopCombinedTagsChunkDataKeyType);
+    strings["key signature"] = kNoteNames[note];
+    strings["key type"] = kKeyTypeNames[type > 0 && type < std::ssize(kKeyTypeNames) ? type : 0];
+}
+
+void addTexts(const Dictionary& tags, tagging::StringPairs& strings)
+{
+    const std::pair<const char*, const char*> texts[] = {
+        {"category", VireoLoopCombinedTagsChunkDataInstrumentTypeKey},
+        {"subcategory", VireoLoopCombinedTagsChunkDataInstrumentSubTypeKey},
+        {"genre", VireoLoopCombinedTagsChunkDataGenreKey},
+    };
+    for (const auto& [name, key] : texts)
+        if (const auto* text = platform::find<std::string>(tags, key))
+            strings[name] = *text;
+    const auto* descriptors = platform::find<platform::Array>(tags, VireoLoopCombinedTagsChunkDataDescriptorsKey);
+    if (descriptors == nullptr)
+        return;
+    std::string joined;
+    for (const platform::Value& value : *descriptors)
+        if (const auto* text = value.get<std::string>())
+            (joined += joined.empty() ? "" : ",") += *text;
+    strings["descriptors"] = joined;
+}
+
+} // namespace
+
+SearchInfo VireoLoopCombinedTagsChunkDataTypes::extractSearchInfoFromData(BytesView payload)
+{
+    SearchInfo info;
+    ByteReader reader(payload);
+    const auto count = reader.read<std::uint32_t>();
+    std::string_view rest = textOf(reader.rest());
+    // A text ends at its NUL, or with the data.
+    const auto nextText = [&rest] {
+        const std::string_view text = rest.substr(0, rest.find('\0'));
+        rest.remove_prefix(std::min(text.size() + 1, rest.size()));
+        return platform::String::fromUTF8(text);
+    };
+    for (std::uint32_t i = 0; i < count && !rest.empty(); ++i) {
+        const platform::String key = nextText();
+        if (rest.empty())
+            break; // a key without a value
+        const platform::String value = nextText();
+        if (key && value)
+            info[key.utf8()] = split(value.utf8(), ',');
+    }
+    return info;
+}
+
+std::int64_t VireoLoopCombinedTagsChunkDataTypes::rootNoteKeyFromCafDict(const SearchInfo& info)
+{
+    constexpr std::int64_t notes[] = {57, 59, 48, 50, 52, 53, 55}; // A to G
+    const std::string* key = firstOf(info, "key signature");
+    if (key == nullptr || key->empty() || key->front() < 'A' || key->front() > 'G')
+        return 0;
+    const char accidental = key->size() > 1 ? (*key)[1] : '\0';
+    return notes[key->front() - 'A'] + (accidental == '#') - (accidental == 'b');
+}
+
+std::int64_t VireoLoopCombinedTagsChunkDataTypes::keyTypeFromCafDict(const SearchInfo& info)
+{
+    const std::string* name = firstOf(info, "key type");
+    for (std::int64_t type = 1; name != nullptr && type < std::ssize(kKeyTypeNames); ++type)
+        if (*name == kKeyTypeNames[type])
+            return type;
+    return 0;
+}
+
+Dictionary VireoLoopCombinedTagsChunkDataTypes::combinedTagsChunkDataDictionaryFromCafChunkData(BytesView payload)
+{
+    const SearchInfo info = extractSearchInfoFromData(payload);
+    Dictionary tags;
+    const auto takeText = [&](const char* name, const char* key) {
+        if (const std::string* text = firstOf(info, name))
+            tags[key] = *text;
+    };
+    takeText("category", VireoLoopCombinedTagsChunkDataInstrumentTypeKey);
+    takeText("subcategory", VireoLoopCombinedTagsChunkDataInstrumentSubTypeKey);
+    takeText("genre", VireoLoopCombinedTagsChunkDataGenreKey);
+    if (const auto found = info.find("descriptors"); found != info.end()) {
+        const std::set<std::string> each(found->second.begin(), found->second.end());
+        tags[VireoLoopCombinedTagsChunkDataDescriptorsKey] = platform::Array(each.begin(), each.end());
+    }
+
+    const std::string* beats = firstOf(info, "beat count");
+    const std::int64_t beatCount = beats != nullptr ? integerValue(*beats) : 0;
+    const auto [top, bottom] = signatureIn(info);
+    tags[VireoLoopCombinedTagsChunkDataMidiRootNoteKey] = rootNoteKeyFromCafDict(info);
+    tags[VireoLoopCombinedTagsChunkDataKeyType] = keyTypeFromCafDict(info);
+    tags[VireoLoopCombinedTagsChunkDataBeatCountKey] = beatCount;
+    tags[VireoLoopCombinedTagsChunkDataSignatureTopKey] = top;
+    tags[VireoLoopCombinedTagsChunkDataSignatureBottomKey] = bottom;
+    tags[VireoLoopCombinedTagsChunkDataFileTypeKey] = top != 0 && beatCount > 0 ? 1 : 2;
+    return tags;
+}
+
+std::optional<Bytes>
+VireoLoopCombinedTagsChunkDataTypes::cafChunkDataFromCombinedTagsChunkDataDictionary(const Dictionary& tags)
+{
+    tagging::StringPairs strings;
+    const std::int64_t beatCount = numberFor(tags, VireoLoopCombinedTagsChunkDataBeatCountKey);
+    if (beatCount > 0)
+        strings["beat count"] = std::to_string(beatCount);
+    const std::int64_t top = numberFor(tags, VireoLoopCombinedTagsChunkDataSignatureTopKey);
+    const std::int64_t bottom = numberFor(tags, VireoLoopCombinedTagsChunkDataSignatureBottomKey);
+    if (numberFor(tags, VireoLoopCombinedTagsChunkDataFileTypeKey) == 1 && top >= 1 && bottom >= 1)
+        strings["time signature"] = std::to_string(top) + "/" + std::to_string(bottom);
+    addKey(tags, strings);
+    addTexts(tags, strings);
+    return CAFInfoStringsData(strings);
+}

@@ -1,0 +1,23 @@
+// The musical tags of a loop: beats, key, signature, category, genre, descriptors.
+#pragma once
+
+#include "loops/VireoLoopCombinedTagsChunkDataTypes.h"
+#include "loops/VireoLoopGenericChunkData.h"
+
+#include <utility>
+
+class KT_EXPORT VireoLoopCombinedTagsChunkData : public VireoLoopGenericChunkData {
+public:
+    bool isEmpty() const override { return _dataDictionary.empty(); }
+    std::optional<Bytes> aifDataRepresentation() const override;
+    std::optional<Bytes> cafDataRepresentation() const override;
+    void readFromAIFData(BytesView data) override;
+    void readFromCafData(BytesView data) override;
+
+    /// Under the VireoLoopCombinedTagsChunkData keys.
+    const platform::Dictionary& dataDictionary() const { return _dataDictionary; }
+    void setDataDictionary(platform::Dictionary tags) { _dataDictionary = std::move(tags); }
+
+private:
+    platform::Dictionary _dataDictionary;
+};

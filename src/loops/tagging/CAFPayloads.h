@@ -1,0 +1,30 @@
+// Builders of what the suite's chunks carry in CAF files: string pairs, transients, and data behind a UUID.
+#pragma once
+
+#include "loops/tagging/ChunkIDs.h"
+#include "platform/core/Bytes.h"
+
+#include <cstdint>
+#include <map>
+#include <optional>
+#include <string>
+
+namespace tagging {
+/// Texts in UTF-8; one that holds a NUL ends there, as the pairs on disk do.
+using StringPairs = std::map<std::string, std::string>;
+} // namespace tagging
+
+// Each returns null when memory is short.
+
+/// Payload of the CAF "info" chunk (published: Core Audio Format specification, Information chunk): a big-endian uint32
+/// count, then key, NUL, value, NUL for each pair, in the dictionary's own order.
+KT_EXPORT std::optional<Bytes> CAFInfoStringsData(const tagging::StringPairs& strings);
+/// The basic tagging UUID, then the same count and pairs.
+KT_EXPORT std::optional<Bytes> CAFBasicUUIDChunkData(const tagging::StringPairs& strings);
+/// The transients UUID, then 20 + 12 × count bytes: version 1, no percentage, no division, a record of type 1 per
+/// frame position, in the given order. A count below 0 counts as 0.
+KT_EXPORT std::optional<Bytes> CAFTransientUUIDChunkData(const std::int64_t* positions, std::int64_t count);
+KT_EXPORT std::optional<Bytes> CAFGenerativeInstrumentsUUIDChunkData(BytesView data);
+KT_EXPORT std::optional<Bytes> CAFStepSequencerUUIDChunkData(BytesView data);
+/// Kept: the data follow the event-sequence UUID, not the one of additional loop data; existing readers rely on it.
+KT_EXPORT std::optional<Bytes> CAFAdditionalLoopDataUUIDChunkData(BytesView data);

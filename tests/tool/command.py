@@ -1,0 +1,88 @@
+"""The command as a process, and small containers built by hand, for the tests beside this file."""
+import json
+import os
+import pathlib
+import pty
+import shutil
+import struct
+import subprocess
+import tempfile
+import unittest
+
+KTFILES = os.environ["KTFILES"]
+MEDIA = pathlib.Path(os.environ["KTFILES_MEDIA"])
+
+
+def chunk(chunk_id, body, order="<", size=None):
+    header = chunk_id + struct.pack(order + "I", len(body) if size is None else size)
+    return header + body + b"\0" * (len(body) & 1)
+
+
+def wave(*chunks, container=b"RIFF", size=None, frames=100):
+    """A 16-bit mono WAVE file with further chunks behind the samples; `size` overrides the container's size field."""
+    fmt = chunk(b"fmt ", struct.pack("<HHIIHH", 1, 1, 48000, 96000, 2, 16))
+    body = b"WAVE" + fmt + chunk(b"data", (bytes(range(251)) * (frames // 125 + 1))[:frames * 2]) + b"".join(chunks)
+    return container + struct.pack("<I", len(body) if size is None else size) + body
+
+
+def caf(*chunks, data_size=None, samples=b"\1\2" * 100):
+    """A 16-bit mono CAF file, `chunks` of (id, body) ahead of the samples; `data_size` overrides their size field."""
+    desc = struct.pack(">d4sIIIII", 44100.0, b"lpcm", 2, 2, 1, 1, 16)
+    items = [(b"desc", desc), *chunks]
+    head = b"caff\0\1\0\0" + b"".join(i + struct.pack(">q", len(b)) + b for i, b in items)
+    size = len(samples) + 4 if data_size is None else data_size
+    return head + b"data" + struct.pack(">qI", size, 0) + samples
+
+
+class CommandTest(unittest.TestCase):
+    """Each test has a folder of its own, which is the command's working folder and must hold no litter at the end."""
+
+    def setUp(self):
+        self.folder = pathlib.Path(tempfile.mkdtemp(prefix="ktfiles-test-"))
+        self.addCleanup(shutil.rmtree, self.folder)
+
+    def write(self, name, content):
+        path = self.folder / name
+        path.write_bytes(content)
+        return path
+
+    def run_command(self, *arguments, status=0, stdin=b"", **options):
+        result = subprocess.run([KTFILES, *arguments], input=stdin, capture_output=True, cwd=self.folder, timeout=60,
+                                **options)
+        self.assertEqual(result.returncode, status, (arguments, result.stdout, result.stderr))
+        return result
+
+    def lines(self, *arguments, **options):
+        return self.run_command(*arguments, **options).stdout.decode().splitlines()
+
+    def json(self, *arguments, **options):
+        return json.loads(self.run_command(arguments[0], "--json", *arguments[1:], **options).stdout)
+
+    def failure(self, *arguments, status=1, **options):
+        """The one line on standard error of a run that fails."""
+        error = self.run_command(*arguments, status=status, **options).stderr.decode()
+        if status == 1:
+            self.assertEqual(error.count("\n"), 1, error)
+            self.assertTrue(error.startswith("ktfiles: "), error)
+        return error
+
+    def on_terminal(self, *arguments, **environment):
+        """What the command writes to a terminal, and its exit status."""
+        process, terminal = pty.fork()
+        if process == 0:
+            os.chdir(self.folder)
+            os.execve(KTFILES, [KTFILES, *arguments], {**os.environ, "TERM": "xterm", **environment})
+        text = b""
+        while True:
+            try:
+                piece = os.read(terminal, 65536)
+            except OSError:  # EIO: the other side is gone
+                piece = b""
+            if not piece:
+                break
+            text += piece
+        os.close(terminal)
+        return text.decode(errors="replace").replace("\r\n", "\n"), os.waitstatus_to_exitcode(os.waitpid(process, 0)[1])
+
+    def assert_no_litter(self, *names):
+        self.assertEqual(sorted(os.listdir(self.folder)), sorted(names))

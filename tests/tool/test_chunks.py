@@ -1,0 +1,100 @@
+"""ktfiles chunks, and chunks get."""
+import os
+import struct
+import subprocess
+import unittest
+
+from command import KTFILES, CommandTest, caf, chunk, wave
+
+
+class List(CommandTest):
+    def test_containers(self):
+        aiff = b"AIFF" + chunk(b"COMM", bytes(18), ">") + chunk(b"ANNO", b"odd", ">")
+        ds64 = chunk(b"ds64", struct.pack("<QQQI", 0, 0, 0, 0))
+        cases = {
+            "a.wav": (wave(chunk(b"\xa9x\\\0", b"abc")), "RIFF", 256,
+                      [("fmt ", 12, 16), ("data", 36, 200), ("\\xA9x\\x5C\\x00", 244, 3)]),
+            "b.wav": (b"RF64" + struct.pack("<I", 40) + b"WAVE" + ds64, "RF64", 48, [("ds64", 12, 28)]),
+            "c.aiff": (b"FORM" + struct.pack(">I", len(aiff)) + aiff, "FORM", 50, [("COMM", 12, 18), ("ANNO", 38, 3)]),
+            "d.caf": (caf((b"info", b"abcd"), data_size=-1), "caff", 284,
+                      [("desc", 8, 32), ("info", 52, 4), ("data", 68, 204)]),
+        }
+        for name, (content, container, end, chunks) in cases.items():
+            self.write(name, content)
+            with self.subTest(name):
+                self.assertEqual(self.json("chunks", name), {
+                    "path": name, "container": container, "containerEnd": end,
+                    "chunks": [dict(zip(("id", "offset", "size"), item)) for item in chunks]})
+                self.assertEqual(self.lines("chunks", name), ["\t".join(map(str, item)) for item in chunks])
+        self.assertEqual(self.lines("chunks", "b.wav", "c.aiff")[0], "b.wav\tds64\t12\t28")
+        several = self.json("chunks", "a.wav", "missing", "d.caf", status=1)
+        self.assertEqual([item.get("error", item["path"]) for item in several], ["a.wav", "file not found", "d.caf"])
+
+    def test_table(self):
+        self.write("a.wav", wave() + b"more")
+        self.assertEqual(self.on_terminal("chunks", "a.wav", NO_COLOR="1")[0],
+                         "a.wav  RIFF, 244 bytes\nID    OFFSET    SIZE\nfmt       12      16\n"
+                         "data      36     200\n4 bytes follow the container\n")
+
+    def test_what_is_no_container(self):
+        self.write("text.wav", b"no audio file at all")
+        self.write("empty.wav", b"")
+        self.write("short.wav", b"RIFF\4\0\0\0WAVEfmt ")
+        for name in ("text.wav", "empty.wav", "short.wav", "missing.wav"):
+            for arguments in (["chunks", name], ["chunks", "get", name, "fmt"], ["chunks", "remove", name, "note"]):
+                self.failure(*arguments)
+            self.failure("chunks", "add", name, "note", stdin=b"x")
+        self.assert_no_litter("text.wav", "empty.wav", "short.wav")
+
+    def test_list_is_not_held_in_memory(self):
+        self.write("many.wav", wave(chunk(b"note", b"") * 400_000))
+        listing = 'ulimit -v $((96 * 1024)); exec "$0" chunks many.wav --json'
+        if "asan" in subprocess.run(["ldd", KTFILES], capture_output=True, text=True).stdout:
+            self.skipTest("an instrumented program reserves more memory than that")
+        result = subprocess.run(["sh", "-c", listing, KTFILES], cwd=self.folder, capture_output=True, timeout=120)
+        self.assertEqual((result.returncode, result.stdout.count(b'"note"')), (0, 400_000), result.stderr)
+
+
+class Get(CommandTest):
+    def test_body(self):
+        self.write("a.wav", wave(chunk(b"note", b"first"), chunk(b"MD5 ", b"\0\1\2"), chunk(b"note", b"last")))
+        self.write("a.caf", caf((b"note", b""), (b"note", b"first"), (b"note", b"last"), data_size=-1))
+        for name, chunk_id, body in (("a.wav", "note", b"last"), ("a.wav", "MD5", b"\0\1\2"),
+                                     ("a.wav", "\\x6Eote", b"last"), ("a.caf", "note", b"first"),
+                                     ("a.caf", "data", bytes(4) + b"\1\2" * 100)):
+            with self.subTest((name, chunk_id)):
+                self.assertEqual(self.run_command("chunks", "get", name, chunk_id).stdout, body)
+        self.assertIn('has no chunk "none"', self.failure("chunks", "get", "a.wav", "none"))
+
+    def test_large_body_in_pieces(self):
+        big = os.urandom(1 << 20) * 3 + b"tail"
+        self.write("a.wav", wave(chunk(b"blob", big)))
+        self.assertEqual(self.run_command("chunks", "get", "a.wav", "blob").stdout, big)
+        self.write("cut.wav", wave(chunk(b"blob", b"abc", size=0xFFFFFF00)))
+        self.assertIn("claims 4294967040 bytes, but 4 are there", self.failure("chunks", "get", "cut.wav", "blob"))
+
+    def test_to_a_file(self):
+        self.write("a.wav", wave(chunk(b"note", b"text")))
+        (self.folder / "link").symlink_to("out")
+        for out in ("out", "link"):  # a new file, then one that is there, through a link
+            self.run_command("chunks", "get", "a.wav", "note", "-o", out, preexec_fn=lambda: os.umask(0o027))
+            self.assertEqual((self.folder / "out").read_bytes(), b"text")
+            self.assertEqual((self.folder / "out").stat().st_mode & 0o777, 0o640)
+        self.assertEqual(self.json("chunks", "get", "a.wav", "note", "-o", "/dev/null"),
+                         {"path": "a.wav", "id": "note", "offset": 244, "size": 4})
+        self.assertIn("over the file itself", self.failure("chunks", "get", "a.wav", "note", "-o", "a.wav"))
+        self.assertIn("is a folder", self.failure("chunks", "get", "a.wav", "note", "-o", "."))
+        self.assertIn("file not found", self.failure("chunks", "get", "a.wav", "note", "-o", "none/out"))
+        self.assert_no_litter("a.wav", "link", "out")
+
+    def test_terminal_gets_text_only(self):
+        self.write("a.wav", wave(chunk(b"note", "Küche".encode())))
+        self.assertEqual(self.on_terminal("chunks", "get", "a.wav", "note"), ("Küche", 0))
+        text, status = self.on_terminal("chunks", "get", "a.wav", "fmt")
+        self.assertIn("is not text", text)
+        self.assertEqual(status, 1)
+        self.assertEqual(self.on_terminal("chunks", "get", "a.wav", "fmt", "-o", "-")[1], 0)
+
+
+if __name__ == "__main__":
+    unittest.main()

@@ -1,0 +1,95 @@
+"""ktfiles scan: every loop below folders, in order, whatever else lies there."""
+import csv
+import io
+import json
+import os
+import shutil
+import struct
+import subprocess
+import unittest
+
+from command import KTFILES, MEDIA, CommandTest
+
+
+class Scan(CommandTest):
+    def loop(self, name, genre="Rock", original="tone-16.aiff"):
+        path = self.folder / name
+        path.parent.mkdir(parents=True, exist_ok=True)
+        shutil.copy(MEDIA / original, path)
+        self.run_command("tags", "set", "./" + name, f"genre={genre}", "beatCount=4", "-q")
+        return path
+
+    def paths(self, *arguments, **options):
+        return [item["path"] for item in self.json("scan", *arguments, **options)]
+
+    def test_finds_loops_and_nothing_else(self):
+        self.loop("lib/b/two.aiff")
+        self.loop("lib/a.caf", original="pluck-24-le.caf")
+        self.loop("lib/b.aif")
+        self.loop("lib/zz", "named like nothing")
+        self.loop("lib/.hidden/x.aiff")
+        for name in ("tone-16.wav", "tone-fl32.aifc", "tone-16.aiff", "README.md"):
+            shutil.copy(MEDIA / name, self.folder / "lib")
+        os.mkfifo(self.folder / "lib/fifo.aiff")
+        expected = ["lib/a.caf", "lib/b/two.aiff", "lib/b.aif", "lib/zz"]
+        self.assertEqual(sorted(self.paths("lib")), sorted(expected))
+        self.assertEqual(self.paths("lib/"), self.paths("lib"))
+        self.assertEqual(self.json("scan", "lib/b.aif"), self.json("tags", "lib/b.aif"))
+        text, status = self.on_terminal("scan", "lib", NO_COLOR="1")
+        self.assertEqual([line.split()[-1] for line in text.splitlines()], ["FILE", *self.paths("lib")])
+        rows = list(csv.DictReader(io.StringIO(self.run_command("scan", "--csv", "lib").stdout.decode(), newline="")))
+        self.assertEqual([(row["path"], row["genre"], row["beatCount"]) for row in rows],
+                         [(item["path"], item["genre"], "4") for item in self.json("scan", "lib")])
+        self.assertEqual([line.split("\t")[0] for line in self.lines("scan", "lib")], self.paths("lib"))
+        self.failure("scan", "lib", "--csv", "--json", status=2)
+
+    def test_csv_quotes(self):
+        path = self.loop('lib/a, "b"\nc.aiff')
+        self.run_command("tags", "set", str(path), "descriptors=x,y", 'title=say "x"')
+        output = self.run_command("scan", "--csv", "lib").stdout.decode()
+        (row,) = csv.DictReader(io.StringIO(output, newline=""))
+        self.assertEqual((row["path"], row["descriptors"], row["title"]), ('lib/a, "b"\nc.aiff', "x,y", 'say "x"'))
+
+    def test_bad_files_are_listed_at_the_end(self):
+        self.loop("lib/good.aiff")
+        for name, content in (("a.aiff", b""), ("b.CAF", b"no caf"), ("c.txt", b"no matter")):
+            (self.folder / "lib" / name).write_bytes(content)
+        (self.folder / "lib/dangling.aif").symlink_to("nowhere")
+        result = self.run_command("scan", "lib", "missing", "--json", status=1)
+        self.assertEqual([item["path"] for item in json.loads(result.stdout)], ["lib/good.aiff"])
+        self.assertEqual([line.split(": ")[1] for line in result.stderr.decode().splitlines()],
+                         ["lib/a.aiff", "lib/b.CAF", "lib/dangling.aif", "missing"])
+
+    def test_links_make_no_circles_and_nothing_is_listed_twice(self):
+        self.loop("lib/deep/one.aiff")
+        self.loop("outside/two.aiff")
+        for link, target in (("lib/deep/up", ".."), ("lib/deep/self", "."), ("lib/above", ".."), ("lib/a", "deep"), ("lib/none", "nowhere"),
+                             ("outside/back", "../lib"), ("lib/out", "../outside")):
+            (self.folder / link).symlink_to(target)
+        self.assertEqual(len(self.paths("lib")), 2)
+        self.assertEqual(len(self.paths("lib/deep", "outside", "lib/deep")), 2)
+
+    def test_order_is_stable_whatever_the_threads_do(self):
+        original = self.loop("lib/0/0000.aiff").read_bytes()
+        for i in range(600):
+            path = self.folder / f"lib/{i % 7}/{i:04}.aiff"
+            path.parent.mkdir(exist_ok=True)
+            # Some take longer: chunks ahead of those looked for.
+            junk = (b"junk" + struct.pack(">I", 0)) * (i % 13 * 40)
+            body = original[8:12] + junk + original[12:]
+            path.write_bytes(b"FORM" + struct.pack(">I", len(body)) + body)
+        expected = sorted(f"lib/{i % 7}/{i:04}.aiff" for i in range(600))
+        for threads in ("1", "2", "16"):
+            self.assertEqual(self.paths("lib", "--threads", threads), expected)
+
+    def test_a_reader_that_goes_away_ends_the_scan(self):
+        for i in range(3):
+            self.loop(f"lib/{i}.aiff")
+        with open("/dev/full", "wb") as full:
+            result = subprocess.run([KTFILES, "scan", "lib"], stdout=full, stderr=subprocess.PIPE, cwd=self.folder,
+                                    timeout=60)
+        self.assertEqual((result.returncode, b"disk full" in result.stderr), (1, True))
+
+
+if __name__ == "__main__":
+    unittest.main()

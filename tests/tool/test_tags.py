@@ -1,0 +1,247 @@
+"""ktfiles tags: show, set, remove and copy, over real AIFF and CAF files, whose samples stay as they are."""
+import itertools
+import json
+import os
+import shutil
+import struct
+import subprocess
+import unittest
+
+from command import MEDIA, CommandTest
+
+SAMPLES = {"a.aiff": "tone-16.aiff", "a.caf": "pluck-24-le.caf"}
+PATCH = b"patch bytes"
+
+
+def aiff_with(path, *chunks):
+    """Puts chunks of (id, body) behind the last one of an AIFF file."""
+    content = path.read_bytes()
+    for chunk_id, body in chunks:
+        content += chunk_id + struct.pack(">I", len(body)) + body + b"\0" * (len(body) & 1)
+    path.write_bytes(content[:4] + struct.pack(">I", len(content) - 8) + content[8:])
+
+
+def category(instrument=b"", sub=b"", genre=b"", descriptors=(), version=1):
+    def text(value):
+        return value.ljust(50, b"\0")
+    return (struct.pack(">I", version) + text(instrument) + text(sub) + text(genre) + bytes(66) +
+            struct.pack(">H", len(descriptors)) + b"".join(map(text, descriptors)))
+
+
+BASIC = struct.pack(">Ii5h", 1, 8, 57, 1, 6, 8, 1) + bytes(64)
+
+
+class TagsTest(CommandTest):
+    def setUp(self):
+        super().setUp()
+        for name, original in SAMPLES.items():
+            shutil.copy(MEDIA / original, self.folder / name)
+        self.samples = {name: self.decoded(name) for name in SAMPLES}
+
+    def decoded(self, name):
+        return subprocess.run(["sox", name, "-t", "raw", "-"], cwd=self.folder, capture_output=True, check=True).stdout
+
+    def tags(self, *names):
+        items = self.json("tags", *names)
+        return items[0] if len(names) == 1 else items
+
+    def set(self, *arguments, **options):
+        return self.run_command("tags", "set", *arguments, **options)
+
+    def assert_sound(self):
+        for name, samples in self.samples.items():
+            self.assertEqual(self.decoded(name), samples, name)
+
+
+class Show(TagsTest):
+    def test_golden_aiff(self):
+        descriptors = (b"Dry", b"Acoustic")
+        aiff_with(self.folder / "a.aiff", (b"basc", BASIC), (b"cate", category(b"Drums", b"Kick", b"Rock", descriptors)),
+                  (b"trns", bytes(72) + struct.pack(">I", 9) + struct.pack(">HHI16x", 1, 0, 77)),  # of 9, one is there
+                  (b"CHST", b"strip"), (b"NAME", b"Ten"), (b"AUTH", b"\xFF"))
+        shown = self.tags("a.aiff")
+        seconds = self.json("info", "a.aiff")[0]["durationSeconds"]
+        self.assertAlmostEqual(shown.pop("tempo"), 8 * 60 / seconds)
+        shown.pop("comments")  # by the program that made the file
+        self.assertEqual(shown, {
+            "path": "a.aiff", "fileType": "AIFF", "beatCount": 8, "midiRootNote": 57, "keyType": 1, "signatureTop": 6,
+            "signatureBottom": 8, "loopFileType": 1, "instrumentType": "Drums", "instrumentSubType": "Kick",
+            "genre": "Rock", "descriptors": ["Acoustic", "Dry"], "title": "Ten",
+            "chunks": [{"id": "CHST", "size": 5}], "transients": [{"type": 1, "frame": 77}]})
+        text, status = self.on_terminal("tags", "a.aiff", NO_COLOR="1")
+        self.assertEqual(status, 0)
+        for line in ("a.aiff  AIFF", "  Key           A minor", "  Signature     6/8", "  Descriptors   Acoustic, Dry",
+                     "  Transients    1", "  Chunks        CHST (5 bytes)"):
+            self.assertIn(line + "\n", text)
+        self.assertIn("key\tA minor", self.lines("tags", "a.aiff"))
+        self.assertIn("a.aiff\tkey\tA minor", self.lines("tags", "a.aiff", "a.caf"))
+
+    def test_damaged_chunks_leave_the_rest(self):
+        for chunks, expected in (
+                ([(b"basc", BASIC), (b"cate", category(b"Drums")[:221])], {"beatCount": 8}),
+                ([(b"cate", category(b"Drums", version=3))], {}),
+                ([(b"cate", category(b"Drums", descriptors=(b"Dry",))[:-1])], {"instrumentType": "Drums"}),
+                ([(b"basc", BASIC[:40]), (b"trns", b"short")], {})):
+            shutil.copy(MEDIA / "tone-16.aiff", self.folder / "a.aiff")
+            aiff_with(self.folder / "a.aiff", *chunks)
+            shown = self.tags("a.aiff")
+            for key in ("beatCount", "instrumentType", "transients"):
+                self.assertEqual(shown.get(key), expected.get(key), (key, chunks))
+
+    def test_what_holds_no_tags_says_so(self):
+        for name in ("tone-16.wav", "tone-fl32.aifc", "README.md"):
+            shutil.copy(MEDIA / name, self.folder)
+        for name, said in (("tone-16.wav", "is a WAVE file; only AIFF and CAF files hold loop tags"),
+                           ("tone-fl32.aifc", "is an AIFC file; only"), ("README.md", "is no AIFF or CAF file"),
+                           ("missing", "not found"), (".", "is a folder")):
+            before = (self.folder / name).read_bytes() if name[0] in "tR" else None
+            for verb in (["tags"], ["tags", "set", "genre=x"], ["tags", "copy", "a.aiff"]):
+                self.assertIn(said, self.failure(*verb, "./" + name))
+            if before:
+                self.assertEqual((self.folder / name).read_bytes(), before)
+        items = json.loads(self.run_command("tags", "--json", "missing", "a.caf", status=1).stdout)
+        self.assertEqual([set(items[0]), items[1]["fileType"]], [{"path", "error"}, "caff"])
+
+
+class Edits(TagsTest):
+    ALL = {"beatCount": 8, "midiRootNote": 54, "keyType": 1, "signatureTop": 12, "signatureBottom": 8,
+           "loopFileType": 1, "instrumentType": "Bass", "instrumentSubType": "Electric", "genre": "Rock",
+           "descriptors": ["Dry", "Grooving"], "title": "Tïtle", "artist": "An Artist", "copyright": "2026",
+           "comments": "Say: a=b, c", "transients": [{"type": 1, "frame": frame} for frame in (0, 1100, 2000)]}
+    ARGUMENTS = ["beatCount=8", "key=Gb", "mode=minor", "signature=12/8", "instrumentType=Bass",
+                 "instrumentSubType=Electric", "genre=Rock", "descriptors=Grooving, Dry,Dry", "title=Tïtle",
+                 "artist=An Artist", "copyright=2026", "comments=Say: a=b, c", "transients=2000,0,1100"]
+
+    def without(self, shown, *keys):
+        return {key: value for key, value in shown.items() if key not in ("path", "fileType", "tempo", *keys)}
+
+    def test_every_tag_in_both_containers(self):
+        self.set("a.aiff", "a.caf", *self.ARGUMENTS)
+        for shown in self.tags("a.aiff", "a.caf"):
+            self.assertEqual(self.without(shown), self.ALL)
+        self.assert_sound()
+        probed = json.loads(subprocess.run(["ffprobe", "-v", "quiet", "-of", "json", "-show_format", "a.caf"],
+                                           cwd=self.folder, capture_output=True).stdout)["format"]["tags"]
+        self.assertEqual([probed[key] for key in ("title", "artist", "copyright", "comments")],
+                         [self.ALL[key] for key in ("title", "artist", "copyright", "comments")])
+        content = [(self.folder / name).read_bytes() for name in SAMPLES]
+        self.assertEqual(self.set("a.aiff", "a.caf", *self.ARGUMENTS).stdout, b"a.aiff: unchanged\na.caf: unchanged\n")
+        self.assertEqual([(self.folder / name).read_bytes() for name in SAMPLES], content)
+
+    def test_what_is_not_named_stays(self):
+        self.set("a.aiff", "a.caf", *self.ARGUMENTS)
+        for argument, key, value in (("genre=Jazz", "genre", "Jazz"), ("title=New", "title", "New"),
+                                     ("beatCount=4", "beatCount", 4), ("artist=", "artist", None),
+                                     ("transients=5", "transients", [{"type": 1, "frame": 5}])):
+            before = self.tags("a.aiff", "a.caf")
+            self.set("a.aiff", "a.caf", argument)
+            for old, new in zip(before, self.tags("a.aiff", "a.caf")):
+                self.assertEqual(new.get(key), value)
+                self.assertEqual(self.without(new, key), self.without(old, key))
+        self.assert_sound()
+
+    def test_a_signature_survives_in_caf_without_beats(self):
+        self.set("a.caf", "signature=3/4")
+        self.set("a.caf", "genre=Waltz")
+        self.assertEqual(self.tags("a.caf")["signatureTop"], 3)
+
+    def test_names_of_notes(self):
+        for name, note in (("C", 48), ("Db", 49), ("C#", 49), ("Eb", 51), ("f#", 54), ("Gb", 54), ("bb", 58), ("B", 59),
+                           ("Cb", 59), ("B#", 48)):
+            self.set("a.aiff", f"key={name}")
+            self.assertEqual(self.tags("a.aiff")["midiRootNote"], note, name)
+        self.set("a.aiff", "midiRootNote=60")
+        self.assertIn("key\t60", self.lines("tags", "a.aiff"))
+
+    def test_mistakes_are_found_before_anything_is_touched(self):
+        content = [(self.folder / name).read_bytes() for name in SAMPLES]
+        wrong = ["genr=x", "beatCount=-1", "beatCount=x", "beatCount=99999999999", "keyType=5", "mode=sad", "key=H",
+                 "key=C##", "signature=4", "signature=4/0", "signature=4/4/4", "signature=4/", "midiRootNote=128",
+                 "loopFileType=3", "transients=1,x", "transients=-1", "transients=99999999", "tempo=120",
+                 "genre=" + "x" * 50, b"title=\xFF"]
+        for argument in wrong:
+            self.failure("tags", "set", "a.aiff", "a.caf", "title=T", argument, status=2)
+        self.failure("tags", "set", "a.aiff", "genre=a", "genre=b", status=2)
+        self.failure("tags", "set", "a.aiff", "key=C", "midiRootNote=49", status=2)
+        self.assertIn("CAF file cannot keep midiRootNote=60",
+                      self.failure("tags", "set", "a.aiff", "a.caf", "midiRootNote=60", status=2))
+        self.assertIn("CAF file cannot keep genre=R,B",
+                      self.failure("tags", "set", "a.aiff", "a.caf", "genre=R,B", status=2))
+        for arguments in (["a.aiff", "genr"], ["genre"], []):
+            self.failure("tags", "remove", *arguments, status=2)
+        self.assertEqual([(self.folder / name).read_bytes() for name in SAMPLES], content)
+        shutil.copy(self.folder / "a.aiff", self.folder / "a=b.aiff")
+        self.set("./a=b.aiff", "genre=x")
+        self.assertEqual(self.tags("a=b.aiff")["genre"], "x")
+
+    def test_remove(self):
+        aiff_with(self.folder / "a.aiff", (b"CHST", b"strip"))
+        self.set("a.aiff", "a.caf", *self.ARGUMENTS)
+        self.run_command("tags", "remove", "a.aiff", "a.caf", "genre", "signature", "title", "transients", "descriptors")
+        for shown in self.tags("a.aiff", "a.caf"):
+            self.assertEqual([shown.get(key) for key in ("genre", "title", "transients", "descriptors", "beatCount")],
+                             [None, None, None, None, 8])
+            self.assertFalse(shown.get("signatureTop"))
+            self.assertEqual(shown["artist"], "An Artist")
+        self.run_command("tags", "remove", "a.aiff", "a.caf")
+        for name, shown in zip(SAMPLES, self.tags("a.aiff", "a.caf")):
+            self.assertEqual(set(shown), {"path", "fileType"})
+            ids = {item["id"] for item in self.json("chunks", name)["chunks"]}
+            self.assertFalse(ids & {"basc", "cate", "trns", "CHST", "uuid", "NAME", "AUTH", "(c) ", "COMT"}, ids)
+        self.assert_sound()
+
+    def test_edit_options(self):
+        for name in SAMPLES:
+            content = (self.folder / name).read_bytes()
+            result = self.set(name, "genre=Rock", "--dry-run")
+            self.assertRegex(result.stdout.decode(), f"^{name}: would set .*genre=Rock\n$")
+            self.assertEqual((self.folder / name).read_bytes(), content)
+            inode = (self.folder / name).stat().st_ino
+            report = self.json("tags", "set", name, "genre=Rock", "--backup", "--in-place")[0]
+            self.assertIn({"key": "genre", "from": None, "to": "Rock"}, report["changes"])
+            self.assertEqual((self.folder / (name + ".bak")).read_bytes(), content)
+            self.assertEqual((self.folder / name).stat().st_ino, inode)
+        self.set("a.aiff", "genre=Jazz", "-q")
+        self.assertIn("genre=Pop (was Jazz)", self.set("a.aiff", "genre=Pop").stdout.decode())
+        self.assert_sound()
+        self.assert_no_litter(*SAMPLES, *(name + ".bak" for name in SAMPLES))
+
+
+class Copy(TagsTest):
+    def test_there_and_back(self):
+        ids = (b"CHST", b"CHSU", b"CHSV", b"PTCH", b"genI", b"Sequ", b"adLD", b"StSq", b".mid")
+        aiff_with(self.folder / "a.aiff", *((chunk_id, chunk_id + PATCH) for chunk_id in ids))
+        self.set("a.aiff", *Edits.ARGUMENTS)
+        shutil.copy(MEDIA / "tone-16.aiff", self.folder / "b.aiff")
+        self.run_command("tags", "copy", "a.aiff", "a.caf")
+        self.run_command("tags", "copy", "a.caf", "b.aiff")
+        first, caf, last = (Edits.without(None, shown) for shown in self.tags("a.aiff", "a.caf", "b.aiff"))
+        self.assertEqual(caf, first)
+        self.assertEqual(last, first)
+        self.assertEqual(len(first["chunks"]), len(ids))
+        for chunk_id in ids:
+            body = self.run_command("chunks", "get", "b.aiff", chunk_id.decode()).stdout
+            self.assertEqual(body, chunk_id + PATCH)
+        self.assertEqual(self.lines("tags", "copy", "a.aiff", "a.caf"), ["a.caf: unchanged"])
+        self.assert_sound()
+
+    def test_losses_are_told_and_the_rest_stays(self):
+        self.set("a.aiff", "midiRootNote=60", "genre=Rock")
+        self.set("a.caf", "artist=Kept", "title=Old", "transients=7")
+        self.assertIn("midiRootNote 60 is not kept", self.run_command("tags", "copy", "a.aiff", "a.caf").stdout.decode())
+        shown = self.tags("a.caf")
+        self.assertEqual([shown[key] for key in ("genre", "artist", "title")], ["Rock", "Kept", "Old"])
+        self.assertEqual(shown["transients"], [{"type": 1, "frame": 7}])
+        self.run_command("tags", "remove", "a.aiff")
+        self.assertIn("has no loop tags", self.failure("tags", "copy", "a.aiff", "a.caf"))
+
+    def test_other_bytes_of_the_same_length(self):
+        aiff_with(self.folder / "a.aiff", (b"PTCH", b"new!"))
+        shutil.copy(MEDIA / "tone-16.aiff", self.folder / "b.aiff")
+        aiff_with(self.folder / "b.aiff", (b"PTCH", b"old!"))
+        self.run_command("tags", "copy", "a.aiff", "b.aiff")
+        self.assertEqual(self.run_command("chunks", "get", "b.aiff", "PTCH").stdout, b"new!")
+
+
+if __name__ == "__main__":
+    unittest.main()

@@ -1,0 +1,27 @@
+#include "Failure.h"
+
+#include "Terminal.h"
+#include "platform/core/Status.h"
+
+#include <fmt/core.h>
+
+#include <cerrno>
+#include <cstdio>
+#include <cstring>
+
+std::string systemErrorText(int error)
+{
+    const std::int32_t status = PosixErrorToOSErr(error);
+    return status == kStatusIOError && error != EIO ? std::strerror(error) : StatusText(status);
+}
+
+void requireOK(std::int32_t status)
+{
+    if (status != kStatusOK)
+        throw Failure(StatusText(status));
+}
+
+void reportFailure(const std::string& path, const std::string& text)
+{
+    fmt::print(stderr, "ktfiles: {}: {}\n", printable(path), printable(text));
+}

@@ -1,0 +1,11 @@
+// Advisory locks by which edits of one file wait for each other, and by which a live temporary file is told from one
+// that a killed process left.
+#pragma once
+
+enum class LockResult { locked, busy, unsupported };
+
+/// Locks the whole file for this descriptor without waiting; the lock ends when the descriptor is closed.
+LockResult tryLock(int descriptor);
+
+/// Waits for the lock; false where the file system has none.
+bool waitForLock(int descriptor);

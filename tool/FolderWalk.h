@@ -1,0 +1,38 @@
+// The files below folders, in a stable order.
+#pragma once
+
+#include <functional>
+#include <set>
+#include <string>
+#include <utility>
+#include <vector>
+
+/// Visits each folder once, in the order of its names' bytes, and holds no more than the names of the folders that it
+/// is in. Names that begin with a dot are left out. Links to files are files; a link to a folder is followed when it
+/// leads out of the folders named, so that nothing is met twice and no circle is walked.
+class FolderWalk {
+public:
+    /// `problem` is empty, or says why a folder could not be read. False ends the walk.
+    using Visit = std::function<bool(const std::string& path, const std::string& problem)>;
+
+    FolderWalk(std::vector<std::string> roots, Visit visit);
+    /// False when it was ended.
+    bool run();
+
+private:
+    struct Entry {
+        std::string name;
+        unsigned char type; // DT_DIR and its like
+    };
+
+    bool walk(const std::string& folder);
+    bool visitEntry(const std::string& path, const Entry& entry);
+    bool isNew(const std::string& folder);
+    bool leadsInside(const std::string& link) const;
+    static std::vector<Entry> entriesOf(const std::string& folder, int& error);
+
+    std::vector<std::string> roots_;
+    std::vector<std::string> resolvedRoots_;
+    Visit visit_;
+    std::set<std::pair<std::uint64_t, std::uint64_t>> seen_; // device and inode of folders
+};

@@ -1,0 +1,169 @@
+// ktfiles info: what audio files are.
+#include "CommandLine.h"
+#include "Failure.h"
+#include "InputFile.h"
+#include "Table.h"
+
+#include <nlohmann/json.hpp>
+
+#include <cmath>
+
+namespace {
+
+AudioFileInfo describe(const std::string& path)
+{
+    CFileIO file;
+    requireOK(file.OpenRead(referenceTo(path), 0));
+    AudioFileInfo info;
+    const std::int32_t status = GetAudioFileInfo(file, 0, info);
+    if (file.GetEOF() == 0)
+        throw Failure("is empty");
+    if (status == kStatusEndOfFile)
+        throw Failure("ends within its header");
+    if (status == kStatusParameterError || (status == kStatusOK && info.containerId == 0))
+        throw Failure("no audio file known here");
+    requireOK(status);
+    return info;
+}
+
+double durationOf(const AudioFileInfo& info)
+{
+    return info.exactSampleRate > 0 ? static_cast<double>(info.frames) / info.exactSampleRate : 0;
+}
+
+// Minutes and seconds, with hours where there are any: "1:02:03.456".
+std::string durationText(double seconds)
+{
+    const auto milliseconds = static_cast<std::int64_t>(std::llround(std::min(seconds, 1e15) * 1000));
+    const std::int64_t minutes = milliseconds / 60'000;
+    const std::int64_t rest = milliseconds % 60'000;
+    const std::string clock =
+        minutes < 60 ? fmt::format("{}", minutes) : fmt::format("{}:{:02}", minutes / 60, minutes % 60);
+    return fmt::format("{}:{:02}.{:03}", clock, rest / 1000, rest % 1000);
+}
+
+std::string rateText(const AudioFileInfo& info)
+{
+    return fmt::format("{:.10g} kHz", info.exactSampleRate / 1000);
+}
+
+std::string channelsText(int channels)
+{
+    return channels == 1 ? "mono" : channels == 2 ? "stereo" : fmt::format("{} channels", channels);
+}
+
+std::string containerText(const AudioFileInfo& info)
+{
+    switch (info.containerId) {
+    case kRIFF:
+        return "WAVE";
+    case kFORM:
+        return fourCCText(info.formType);
+    case kCaff:
+        return "CAF";
+    case kCAT:
+        return "REX2";
+    default:
+        return fourCCText(info.containerId);
+    }
+}
+
+std::string formatText(const AudioFileInfo& info)
+{
+    constexpr FourCC kWaveTag = 0x6D730000; // "ms" and the number of the format in a WAVE file
+    if (info.compressed && (info.formatCode & 0xFFFF0000) == kWaveTag)
+        return fmt::format("format 0x{:04X}", info.formatCode & 0xFFFF);
+    if (info.compressed)
+        return fmt::format("{}", fourCCText(info.formatCode));
+    return fmt::format("{}-bit{}", info.bitsPerSample, info.floatingPoint ? " float" : "");
+}
+
+nlohmann::ordered_json asJson(const std::string& path, const AudioFileInfo& info)
+{
+    return {{"path", path},
+            {"container", fourCCText(info.containerId)},
+            {"fileType", fourCCText(info.fileType)},
+            {"formatCode", fourCCText(info.formatCode)},
+            {"sampleRate", info.sampleRate},
+            {"bitsPerSample", info.bitsPerSample},
+            {"channels", info.channels},
+            {"floatingPoint", info.floatingPoint},
+            {"frames", info.frames},
+            {"durationSeconds", durationOf(info)},
+            {"dataOffset", info.dataOffset},
+            {"fileLength", info.fileLength}};
+}
+
+// Writes the descriptions in one of the forms, each as soon as it is known where the form allows that.
+class InfoWriter {
+public:
+    explicit InfoWriter(const OutputOptions& options) : form_(outputForm(options)), color_(usesColor(options.color)) {}
+
+    void add(const std::string& path, const AudioFileInfo& info)
+    {
+        if (form_ == Form::json)
+            addJson(asJson(path, info));
+        else if (form_ == Form::table)
+            table_.add({printable(path), containerText(info), durationText(durationOf(info)), rateText(info),
+                        formatText(info), channelsText(info.channels)});
+        else if (form_ == Form::lines)
+            output_.print("{}\t{}\t{:.6f}\t{}\t{}\t{}\n", printable(path), containerText(info), durationOf(info),
+                          info.sampleRate, formatText(info), info.channels);
+    }
+
+    void addFailure(const std::string& path, const std::string& text)
+    {
+        if (form_ == Form::json)
+            addJson({{"path", path}, {"error", text}});
+    }
+
+    void finish()
+    {
+        if (form_ == Form::json)
+            output_.print("{}]\n", first_ ? "[" : "\n");
+        table_.print(output_, color_);
+    }
+
+private:
+    void addJson(const nlohmann::ordered_json& object)
+    {
+        output_.print("{}{}", std::exchange(first_, false) ? "[\n" : ",\n", jsonText(object));
+    }
+
+    Form form_;
+    bool color_;
+    bool first_ = true;
+    Output& output_ = Output::standard();
+    Table table_{{{"FILE"}, {"TYPE"}, {"DURATION", Align::right}, {"RATE", Align::right}, {"FORMAT"}, {"CHANNELS"}}};
+};
+
+bool runInfo(const std::vector<std::string>& files, const OutputOptions& options)
+{
+    InfoWriter writer(options);
+    bool good = true;
+    for (const std::string& path : files) {
+        if (Output::standard().failed())
+            break;
+        try {
+            writer.add(path, describe(path));
+        } catch (const Failure& failure) {
+            good = false;
+            writer.addFailure(path, failure.what());
+            reportFailure(path, failure.what());
+        }
+    }
+    writer.finish();
+    return good;
+}
+
+void declareInfo(CommandLine& commandLine)
+{
+    static std::vector<std::string> files;
+    CLI::App& verb = commandLine.addVerb("info", "Say what audio files are: length, rate, format, channels",
+                                         [&commandLine] { return runInfo(files, commandLine.output()); });
+    CommandLine::addFiles(verb, files)->required();
+}
+
+const VerbRegistration registration{10, declareInfo};
+
+} // namespace

@@ -1,0 +1,244 @@
+#include "LoopTags.h"
+
+#include "InputFile.h"
+#include "LoopTagFields.h"
+#include "Output.h"
+#include "audiofile/ContainerHeaders.h"
+#include "loops/VireoLoopUserDataUtils.h"
+
+#include <nlohmann/json.hpp>
+
+#include <cmath>
+#include <filesystem>
+
+using platform::AudioFile;
+
+namespace {
+
+template <class Chunk>
+Chunk& addChunk(VireoLoopChunkList& list)
+{
+    auto chunk = std::make_unique<Chunk>();
+    Chunk& added = *chunk;
+    list.push_back(std::move(chunk));
+    return added;
+}
+
+void readLength(AudioFile& file, LoopTags& tags)
+{
+    platform::StreamDescription format;
+    std::uint64_t packets = 0;
+    if (file.dataFormat(format) != kStatusOK || file.audioDataPacketCount(packets) != kStatusOK)
+        return;
+    tags.sampleRate = format.sampleRate;
+    tags.frames = packets * format.framesPerPacket;
+}
+
+// The size of a chunk's body; none when the file does not have it.
+std::optional<std::uint32_t> sizeOf(const VireoLoopBaseChunk& chunk, AudioFile& file, FourCC fileType)
+{
+    const bool aiff = fileType == kAIFF;
+    if (aiff && chunk.aifChunkID() == 0)
+        return std::nullopt;
+    const bool byUUID = !aiff && chunk.cafChunkIsUUIDChunk();
+    const auto index = byUUID ? VireoLoopUUIDUserDataUtils::find(file, *chunk.cafChunkUUID()) : 0;
+    std::uint32_t size = 0;
+    if (!index || file.userDataSize(aiff ? chunk.aifChunkID() : chunk.cafChunkID(), *index, size) != kStatusOK)
+        return std::nullopt;
+    return byUUID ? size - static_cast<std::uint32_t>(tagging::kUUIDSize) : size;
+}
+
+std::vector<LoopTags::Chunk> carriedChunks(AudioFile& file, FourCC fileType)
+{
+    std::vector<LoopTags::Chunk> found;
+    for (const auto& chunk : VireoLoopChunks::Empty())
+        if (dynamic_cast<const VireoLoopGenericChunkData*>(&chunk->chunkData()) != nullptr &&
+            dynamic_cast<const VireoLoopCombinedTagsChunkData*>(&chunk->chunkData()) == nullptr)
+            if (const auto size = sizeOf(*chunk, file, fileType))
+                found.push_back({carriedChunkName(*chunk), *size});
+    return found;
+}
+
+std::string keyText(const LoopTags& tags)
+{
+    const std::int64_t note = tags.number(VireoLoopCombinedTagsChunkDataMidiRootNoteKey);
+    const std::int64_t type = tags.number(VireoLoopCombinedTagsChunkDataKeyType);
+    const std::string mode = type == 0   ? ""
+                             : type == 3 ? "neither major nor minor"
+                             : type == 4 ? "major and minor"
+                                         : modeName(type);
+    if (note == 0)
+        return mode;
+    return noteName(note) + (mode.empty() ? "" : " " + mode);
+}
+
+std::string signatureText(const LoopTags& tags)
+{
+    const std::int64_t top = tags.number(VireoLoopCombinedTagsChunkDataSignatureTopKey);
+    const std::int64_t bottom = tags.number(VireoLoopCombinedTagsChunkDataSignatureBottomKey);
+    return top == 0 && bottom == 0 ? "" : fmt::format("{}/{}", top, bottom);
+}
+
+std::string numberText(std::int64_t number)
+{
+    return number == 0 ? "" : std::to_string(number);
+}
+
+std::string descriptorsText(const LoopTags& tags)
+{
+    std::string joined;
+    if (const auto* list = platform::find<platform::Array>(tags.combined, VireoLoopCombinedTagsChunkDataDescriptorsKey))
+        for (const platform::Value& value : *list)
+            if (const auto* text = value.get<std::string>())
+                joined += (joined.empty() ? "" : ", ") + *text;
+    return joined;
+}
+
+std::string chunksText(const LoopTags& tags)
+{
+    std::string text;
+    for (const LoopTags::Chunk& chunk : tags.chunks)
+        text += fmt::format("{}{} ({} bytes)", text.empty() ? "" : ", ", chunk.id, chunk.size);
+    return text;
+}
+
+nlohmann::ordered_json jsonValue(const platform::Value& value)
+{
+    if (const auto* number = value.get<std::int64_t>())
+        return *number;
+    if (const auto* text = value.get<std::string>())
+        return *text;
+    auto list = nlohmann::ordered_json::array();
+    if (const auto* values = value.get<platform::Array>())
+        for (const platform::Value& each : *values)
+            list.push_back(jsonValue(each));
+    return list;
+}
+
+} // namespace
+
+std::int64_t LoopTags::number(std::string_view key) const
+{
+    const auto* number = platform::find<std::int64_t>(combined, key);
+    return number != nullptr ? *number : 0;
+}
+
+std::string LoopTags::text(std::string_view key) const
+{
+    const auto* text = platform::find<std::string>(combined, key);
+    if (text == nullptr)
+        text = platform::find<std::string>(info, key);
+    return text != nullptr ? *text : std::string();
+}
+
+double LoopTags::tempo() const
+{
+    const std::int64_t beats = number(VireoLoopCombinedTagsChunkDataBeatCountKey);
+    const bool known = beats > 0 && frames > 0 && std::isfinite(sampleRate) && sampleRate > 0;
+    return known ? static_cast<double>(beats) * 60 * sampleRate / static_cast<double>(frames) : 0;
+}
+
+const char* loopContainerName(FourCC fileType)
+{
+    return fileType == kAIFF ? "AIFF" : "CAF";
+}
+
+VireoLoopChunksManager openLoopFile(const std::string& path, AudioFile::Permission permission)
+{
+    requireRegularFile(path);
+    std::error_code error;
+    const std::filesystem::path absolute = std::filesystem::absolute(path, error);
+    const platform::String location = platform::String::fromFileSystemRepresentation(absolute.c_str());
+    if (location.isNull())
+        throw Failure("its path is not valid UTF-8");
+    VireoLoopChunksManager manager(platform::URL::createWithFileSystemPath(location, platform::PathStyle::posix, false),
+                                   permission);
+    if (manager.status() == kStatusParameterError)
+        throw NoLoopContainer("is no AIFF or CAF file", false);
+    requireOK(manager.status());
+    const FourCC type = manager.audioFileTypeID();
+    if (type != kAIFF && type != kCaff)
+        throw NoLoopContainer(fmt::format("is {} file; only AIFF and CAF files hold loop tags",
+                                          type == kWAVE ? "a WAVE" : "an " + fourCCText(type)),
+                              true);
+    return manager;
+}
+
+LoopTags readLoopTags(const std::string& path)
+{
+    VireoLoopChunksManager manager = openLoopFile(path, AudioFile::Permission::read);
+    VireoLoopChunkList list;
+    auto& info = addChunk<VireoLoopFileInfoChunk>(list);
+    auto& combined = addChunk<VireoLoopCombinedTaggingChunk>(list);
+    auto& transients = addChunk<VireoLoopTransientChunk>(list);
+    manager.readChunks(list);
+    LoopTags tags;
+    tags.fileType = manager.audioFileTypeID();
+    tags.info = info.fileInfo().dataDictionary();
+    tags.combined = combined.tags().dataDictionary();
+    tags.transients = transients.transients().transients();
+    readLength(*manager.audioFile(), tags);
+    tags.chunks = carriedChunks(*manager.audioFile(), tags.fileType);
+    return tags;
+}
+
+std::vector<TagLine> tagLines(const LoopTags& tags)
+{
+    const std::int64_t type = tags.number(VireoLoopCombinedTagsChunkDataFileTypeKey);
+    const double tempo = tags.tempo();
+    std::vector<TagLine> lines{
+        {"tempo", "Tempo", tempo > 0 ? fmt::format("{:.10g}", std::round(tempo * 100) / 100) : ""},
+        {"beatCount", "Beats", numberText(tags.number(VireoLoopCombinedTagsChunkDataBeatCountKey))},
+        {"key", "Key", keyText(tags)},
+        {"signature", "Signature", signatureText(tags)},
+        {"loopFileType", "Kind",
+         type == 1   ? "loop"
+         : type == 2 ? "not a loop"
+                     : numberText(type)},
+        {"instrumentType", "Category", tags.text(VireoLoopCombinedTagsChunkDataInstrumentTypeKey)},
+        {"instrumentSubType", "Sub-category", tags.text(VireoLoopCombinedTagsChunkDataInstrumentSubTypeKey)},
+        {"genre", "Genre", tags.text(VireoLoopCombinedTagsChunkDataGenreKey)},
+        {"descriptors", "Descriptors", descriptorsText(tags)},
+        {"title", "Title", tags.text(VireoLoopFileInfoChunkDataTitleKey)},
+        {"artist", "Artist", tags.text(VireoLoopFileInfoChunkDataArtistKey)},
+        {"copyright", "Copyright", tags.text(VireoLoopFileInfoChunkDataCopyrightKey)},
+        {"comments", "Comments", tags.text(VireoLoopFileInfoChunkDataCommentsKey)},
+        {"transients", "Transients", numberText(std::ssize(tags.transients))},
+        {"chunks", "Chunks", chunksText(tags)}};
+    std::erase_if(lines, [](const TagLine& line) { return line.text.empty(); });
+    return lines;
+}
+
+nlohmann::ordered_json tagsWithoutTransients(const LoopTags& tags)
+{
+    nlohmann::ordered_json json = nlohmann::ordered_json::object();
+    for (const TagField& field : tagFields()) {
+        const platform::Dictionary& values = field.isFileInfo ? tags.info : tags.combined;
+        const auto found = field.key != nullptr ? values.find(field.key) : values.end();
+        if (found != values.end())
+            json[field.name] = jsonValue(found->second);
+    }
+    if (const double tempo = tags.tempo(); tempo > 0)
+        json["tempo"] = tempo;
+    for (const LoopTags::Chunk& chunk : tags.chunks)
+        json["chunks"].push_back({{"id", chunk.id}, {"size", chunk.size}});
+    return json;
+}
+
+std::string loopTagsJson(const std::string& path, const LoopTags& tags)
+{
+    nlohmann::ordered_json json{{"path", path}, {"fileType", fourCCText(tags.fileType)}};
+    json.update(tagsWithoutTransients(tags));
+    std::string text = jsonText(json);
+    if (tags.transients.empty())
+        return text;
+    text.pop_back(); // "}"
+    text += ",\"transients\":";
+    char separator = '[';
+    for (const VireoLoopTransient& transient : tags.transients) {
+        fmt::format_to(std::back_inserter(text), "{}{{\"type\":{},\"frame\":{}}}", separator, transient.transientType(),
+                       transient.frame());
+        separator = ',';
+    }
+    return text + "]}";
+}

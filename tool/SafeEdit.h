@@ -1,0 +1,47 @@
+// Edits that cannot leave a file half done: the change is made to a copy in the same folder, which then takes the
+// place of the original with its mode, owner, times and extended attributes.
+#pragma once
+
+#include "Descriptor.h"
+
+#include <functional>
+#include <string>
+#include <sys/stat.h>
+
+/// The options that every edit takes.
+struct EditOptions {
+    bool inPlace = false; // change the file itself: for recordings too large to copy
+    bool dryRun = false;
+    bool backup = false; // keep the original as NAME.bak, NAME.bak.1 and so on
+    bool quiet = false;
+};
+
+/// One edit of one file. From construction to destruction the file is locked against other edits by this command;
+/// they wait. Throws Failure.
+class SafeEdit {
+public:
+    /// Follows symbolic links to the file itself, which must be regular and writable.
+    SafeEdit(const std::string& path, const EditOptions& options);
+
+    /// The file to be changed, symbolic links resolved: look at it here before `apply`.
+    const std::string& target() const { return target_; }
+
+    /// Calls `change` with the path of the file to change. When it throws, the original is as it was, to the byte; with
+    /// `inPlace` it is as `change` left it. Returns the path of the backup, or an empty string.
+    std::string apply(const std::function<void(const std::string& path)>& change);
+
+private:
+    void open();
+    void waitForOthers();
+    bool isStillAtTarget() const;
+    void requireUntouched() const;
+    std::string applyToCopy(const std::function<void(const std::string&)>& change);
+    std::string applyInPlace(const std::function<void(const std::string&)>& change);
+    std::string backupByLink() const;
+    std::string backupByCopy() const;
+
+    std::string target_;
+    EditOptions options_;
+    Descriptor file_;
+    struct stat status_ = {}; // when the edit began
+};

@@ -1,0 +1,59 @@
+# Completion of the command ktfiles for bash.
+
+_ktfiles()
+{
+    local cur prev words cword
+    _init_completion || return
+
+    local common='--json --quiet --color --help' edit='--in-place --dry-run --backup'
+    local keys='beatCount midiRootNote keyType signatureTop signatureBottom loopFileType instrumentType
+        instrumentSubType genre descriptors title artist copyright comments transients key mode signature'
+    local verb=${words[1]} object=${words[2]}
+
+    case $prev in
+        --color) COMPREPLY=($(compgen -W 'auto always never' -- "$cur")); return ;;
+        --from | -o | --output) _filedir; return ;;
+    esac
+
+    if ((cword == 1)); then
+        COMPREPLY=($(compgen -W 'info chunks tags scan help --help --version' -- "$cur"))
+    elif [[ $verb == help ]]; then
+        if ((cword == 2)); then
+            COMPREPLY=($(compgen -W 'info chunks tags scan' -- "$cur"))
+        elif ((cword == 3)) && [[ $object == chunks ]]; then
+            COMPREPLY=($(compgen -W 'get add remove' -- "$cur"))
+        elif ((cword == 3)) && [[ $object == tags ]]; then
+            COMPREPLY=($(compgen -W 'set remove copy' -- "$cur"))
+        fi
+    elif [[ $cur == -* ]]; then
+        case $verb/$object in
+            chunks/get) COMPREPLY=($(compgen -W "--output $common" -- "$cur")) ;;
+            chunks/add) COMPREPLY=($(compgen -W "--from --replace --force $edit $common" -- "$cur")) ;;
+            chunks/remove) COMPREPLY=($(compgen -W "--force $edit $common" -- "$cur")) ;;
+            tags/set | tags/remove | tags/copy) COMPREPLY=($(compgen -W "$edit $common" -- "$cur")) ;;
+            scan/*) COMPREPLY=($(compgen -W "--csv --threads $common" -- "$cur")) ;;
+            *) COMPREPLY=($(compgen -W "$common" -- "$cur")) ;;
+        esac
+    elif [[ $verb == chunks && $object == @(get|add|remove) ]] && ((cword == 4)) && [[ $prev != -* ]]; then
+        # The ids of the file's chunks; readarray, since an id may hold spaces.
+        local id ids
+        readarray -t ids < <(command ktfiles chunks "${prev/#\~/$HOME}" 2>/dev/null | cut -f1 | sort -u)
+        for id in "${ids[@]%%*( )}"; do
+            [[ $id == "$cur"* ]] && COMPREPLY+=("$(printf %q "$id")")
+        done
+    elif [[ $verb == scan ]]; then
+        _filedir -d
+    else
+        _filedir
+        if ((cword > 3)) && [[ $verb/$object == tags/set ]]; then
+            COMPREPLY+=($(compgen -S = -W "$keys" -- "$cur"))
+            compopt -o nospace
+        elif ((cword > 3)) && [[ $verb/$object == tags/remove ]]; then
+            COMPREPLY+=($(compgen -W "$keys" -- "$cur"))
+        elif ((cword == 2)) && [[ $verb == tags ]]; then
+            COMPREPLY+=($(compgen -W 'set remove copy' -- "$cur"))
+        elif ((cword == 2)) && [[ $verb == chunks ]]; then
+            COMPREPLY+=($(compgen -W 'get add remove' -- "$cur"))
+        fi
+    fi
+} && complete -F _ktfiles ktfiles

@@ -1,0 +1,27 @@
+// The command `ktfiles`. Each verb is a file of its own, and registers itself with the command line.
+#include "CommandLine.h"
+#include "platform/Log.h"
+
+#include <csignal>
+#include <fcntl.h>
+#include <unistd.h>
+
+namespace {
+
+// A file opened while a standard descriptor is closed would take its number, and our output.
+void occupyStandardDescriptors()
+{
+    for (const int descriptor : {STDIN_FILENO, STDOUT_FILENO, STDERR_FILENO})
+        if (::fcntl(descriptor, F_GETFD) < 0)
+            ::open("/dev/null", descriptor == STDERR_FILENO ? O_WRONLY : O_RDONLY);
+}
+
+} // namespace
+
+int main(int argc, char** argv)
+{
+    occupyStandardDescriptors();
+    std::signal(SIGXFSZ, SIG_IGN);    // a file size limit is an error like a full disk
+    platform::setLogHandler(nullptr); // what went wrong is said in one line of our own
+    return CommandLine().run(argc, argv);
+}

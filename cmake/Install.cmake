@@ -7,7 +7,7 @@ install(TARGETS KTFiles EXPORT KTFilesTargets
     LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR} COMPONENT runtime NAMELINK_COMPONENT development)
 
 # The headers of implementations (platform/posix/ and the like) are nobody's business.
-foreach(room platform/core platform files audiofile)
+foreach(room platform/core platform files loops/tagging audiofile loops)
     file(GLOB headers CONFIGURE_DEPENDS ${PROJECT_SOURCE_DIR}/src/${room}/*.h)
     install(FILES ${headers} DESTINATION ${CMAKE_INSTALL_INCLUDEDIR}/KTFiles/${room} COMPONENT development)
 endforeach()
@@ -20,6 +20,8 @@ write_basic_package_version_file(${PROJECT_BINARY_DIR}/KTFilesConfigVersion.cmak
 install(FILES ${PROJECT_BINARY_DIR}/KTFilesConfig.cmake ${PROJECT_BINARY_DIR}/KTFilesConfigVersion.cmake
     DESTINATION ${package_folder} COMPONENT development)
 
+file(RELATIVE_PATH prefix_from_pc /${CMAKE_INSTALL_LIBDIR}/pkgconfig /)
+string(REGEX REPLACE "/$" "" prefix_from_pc ${prefix_from_pc})
 configure_file(cmake/KTFiles.pc.in ${PROJECT_BINARY_DIR}/KTFiles.pc @ONLY)
 install(FILES ${PROJECT_BINARY_DIR}/KTFiles.pc DESTINATION ${CMAKE_INSTALL_LIBDIR}/pkgconfig COMPONENT development)
 

@@ -112,8 +112,8 @@ bool CFileRef::SetFromColonPath(const char* path, bool isDirectory)
     String text = platform::decodeCString(path, mLocalEncoding);
     if (text.isNull())
         text = platform::decodeCString(path, platform::systemTextEncoding());
-    if (text.isNull())
-        text = platform::decodeCString(path, platform::kTextEncodingUnicode16);
+    if (text.isNull() && path != nullptr) // only a zero byte is sure to end it: to look for two would read past it
+        text = platform::decodeText(path, platform::kTextEncodingUnicode16);
     return Set(platform::URL::createWithFileSystemPath(text, PathStyle::colon, isDirectory));
 }
 

@@ -2,6 +2,8 @@
 // types are those in use.
 #include "audiofile/ContainerDescriptions.h"
 
+#include "loops/tagging/ChunkIDs.h"
+#include "loops/tagging/Chunks.h"
 #include "platform/core/ByteReader.h"
 
 #include <cmath>
@@ -105,6 +107,13 @@ void setSoundData(FileWindow& file, const ContainerChkExtended& header, const Ch
     SetSampleData(info, body + skipped, unfinished ? UINT64_MAX : size - skipped);
 }
 
+std::optional<tagging::LoopTiming> readLoopTiming(FileWindow& file, std::int64_t body, std::int64_t size)
+{
+    std::array<std::byte, sizeof(tagging::BasicTaggingChunk)> bytes;
+    const bool there = size >= std::int64_t{bytes.size()} && file.read(bytes.data(), body, bytes.size()) == kStatusOK;
+    return there ? tagging::LoopTimingInAIFF(bytes) : std::nullopt;
+}
+
 void setFormat(const Common& common, bool isAIFC, AudioFileInfo& info)
 {
     info.channels = std::max<std::int16_t>(common.channels, 0);
@@ -142,6 +151,7 @@ std::int32_t DescribeAIFF(FileWindow& file, AudioFileInfo& info)
     info.containerId = header.id;
     info.formType = header.formType;
     std::optional<Common> common;
+    std::optional<tagging::LoopTiming> timing;
     bool hasData = false;
     VisitChunks(file, header, [&](const ChkHeader& chunk, std::int64_t body) {
         if (chunk.id == fourCC("COMM") && !common) {
@@ -149,12 +159,15 @@ std::int32_t DescribeAIFF(FileWindow& file, AudioFileInfo& info)
         } else if (chunk.id == fourCC("SSND") && !hasData) {
             setSoundData(file, header, chunk, body, info);
             hasData = true;
+        } else if (chunk.id == tagging::kBasicTagging && !timing) {
+            timing = readLoopTiming(file, body, chunk.EffectiveSize(header));
         }
-        return !(common && hasData);
+        return !(common && hasData && timing);
     });
     if (!common)
         return kStatusEndOfFile;
     setFormat(*common, header.formType == kAIFC, info);
+    SetLoopTiming(info, timing);
     // Without frames there need be no sound data.
     return hasData || common->frames == 0 ? kStatusOK : kStatusEndOfFile;
 }

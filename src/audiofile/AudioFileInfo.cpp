@@ -80,6 +80,18 @@ void SetSampleData(AudioFileInfo& info, std::int64_t offset, std::uint64_t size)
     info.dataSize = static_cast<std::int64_t>(std::min<std::uint64_t>(size, static_cast<std::uint64_t>(there)));
 }
 
+void SetLoopTiming(AudioFileInfo& info, const std::optional<tagging::LoopTiming>& timing)
+{
+    if (!timing)
+        return;
+    const double beats = std::max(timing->beatCount, 0);
+    info.beatCount = static_cast<float>(beats);
+    info.timingFlag = 1;
+    info.loopCount = timing->isLoop ? 1 : 0;
+    if (info.frames > 0)
+        info.loopValue = static_cast<float>(beats * 60 * info.exactSampleRate / static_cast<double>(info.frames));
+}
+
 std::uint32_t AudioFileInfo::VireoLoopTempo() const
 {
     const double tempo = beatCount * 300000.0 * static_cast<double>(sampleRate) / static_cast<double>(frames);

@@ -39,11 +39,11 @@ struct KT_EXPORT AudioFileInfo {
     std::int64_t frames = 0;
     std::int64_t fileLength = 0;
 
-    // Loop metadata. GetAudioFileInfo leaves it as it is here: it is for those who read the suite's chunks to fill.
+    // The loop, as the basic tagging chunk of an AIFF or CAF file tells of it.
     float beatCount = 0;         // 0: the file carries none
-    std::int32_t timingFlag = 0; // non-zero: the loop's timing is known
-    std::int64_t loopCount = 0;  // at least 1, with loopValue above 0: a tagged loop
-    float loopValue = 0;
+    std::int32_t timingFlag = 0; // 1: the file has the chunk, so that the timing is known, also that there is none
+    std::int64_t loopCount = 0;  // 1: the file is a loop
+    float loopValue = 0;         // tempo in beats per minute; 0 without beats, frames or a sample rate
 
     // The container and the stored format.
     FourCC containerId = 0; // "RIFF", "RF64", "BW64", "FORM", "caff", "CAT "; 0 when unknown

@@ -3,6 +3,7 @@
 #include "audiofile/ContainerDescriptions.h"
 #include "audiofile/ContainerWalk.h"
 
+#include "loops/tagging/ChunkIDs.h"
 #include "platform/core/ByteReader.h"
 
 #include <optional>
@@ -30,6 +31,7 @@ struct PacketTable {
 struct Chunks {
     std::optional<Description> description;
     std::optional<PacketTable> packetTable;
+    std::optional<tagging::LoopTiming> timing;
     std::uint32_t speakers = 0;
     bool hasData = false;
 };
@@ -73,10 +75,25 @@ std::uint32_t readSpeakers(FileWindow& file, std::int64_t body)
     return named ? loadBE<std::uint32_t>(bytes.data() + 4) : 0;
 }
 
+std::optional<tagging::LoopTiming> readLoopTiming(FileWindow& file, std::int64_t body, std::int64_t size)
+{
+    constexpr std::int64_t most = 1 << 20; // bytes of text that are looked at
+    tagging::UUIDBytes uuid;
+    if (size < std::int64_t{sizeof uuid} || file.read(uuid, body, sizeof uuid) != kStatusOK ||
+        cafChunkUUIDToChunkID(&uuid) != tagging::kBasicTagging)
+        return std::nullopt;
+    const std::int64_t start = body + std::int64_t{sizeof uuid};
+    const std::int64_t there = std::min(size - std::int64_t{sizeof uuid}, file.length() - start);
+    Bytes payload(static_cast<std::size_t>(std::clamp<std::int64_t>(there, 0, most)));
+    payload.resize(file.readPieces(payload.data(), start, payload.size()));
+    return tagging::LoopTimingInCAF(payload);
+}
+
 // Whether there is nothing more to look for: a packet table may stand behind the data that it tells of.
 bool isComplete(const Chunks& chunks)
 {
-    return chunks.description && chunks.hasData && (chunks.description->format == kLinearPCM || chunks.packetTable);
+    return chunks.timing && chunks.description && chunks.hasData &&
+           (chunks.description->format == kLinearPCM || chunks.packetTable);
 }
 
 void readChunk(FileWindow& file, FourCC id, std::int64_t body, std::int64_t size, Chunks& chunks, AudioFileInfo& info)
@@ -87,6 +104,8 @@ void readChunk(FileWindow& file, FourCC id, std::int64_t body, std::int64_t size
         chunks.packetTable = readPacketTable(file, body);
     } else if (id == fourCC("chan")) {
         chunks.speakers = readSpeakers(file, body);
+    } else if (id == kUuid && !chunks.timing) {
+        chunks.timing = readLoopTiming(file, body, size);
     } else if (id == kData && !chunks.hasData) {
         // -1, and in a file that was never finished 0: to the end of the file.
         const std::int64_t samples = size > 0 ? std::max<std::int64_t>(size - kEditCountSize, 0) : INT64_MAX;
@@ -153,5 +172,6 @@ std::int32_t DescribeCAF(FileWindow& file, AudioFileInfo& info)
         info.formatCode = description.format;
         info.frames = compressedFrames(description, chunks.packetTable, info);
     }
+    SetLoopTiming(info, chunks.timing);
     return chunks.hasData ? kStatusOK : kStatusEndOfFile;
 }

@@ -79,6 +79,11 @@ public:
     /// out.
     std::int32_t RemoveChunk(unsigned int id);
 
+    /// Replaces the positions in an AIFF file's "trns" chunk; everything else in it is kept. False, with nothing
+    /// written, when there is no such chunk of at least 76 bytes, for a count below 0 or beyond 178,956,967, and when
+    /// memory is short; false too when the replacement fails.
+    bool ReplaceVireoLoopTransients(const std::int64_t* positions, std::int64_t count);
+
     /// Rewrites the header from the description when samples were written.
     std::int32_t UpdateHeader();
     /// Rewrites the header for a number of frames and sets the file's length to match.
@@ -105,8 +110,9 @@ public:
     // work on a handle of the audio-file service, not on the file that this object has open.
 
     /// Opens the file for reading and writing and calls `block` with the handle; nothing happens when it cannot be
-    /// opened.
-    static void PerformAudioFileOperations(const CFileRef& ref, const std::function<void(platform::AudioFile&)>& block);
+    /// opened, which the status tells.
+    static std::int32_t PerformAudioFileOperations(const CFileRef& ref,
+                                                   const std::function<void(platform::AudioFile&)>& block);
     /// `data` and `size` include the UUID and are valid during the call only; `index` is always 0.
     using UUIDChunkBlock =
         std::function<void(const unsigned char* uuid, void* data, unsigned int size, int index, bool* stop)>;

@@ -41,15 +41,16 @@ bool matches(const unsigned char* uuid, const unsigned char* other)
 
 } // namespace
 
-void CAudioFileIO::PerformAudioFileOperations(const CFileRef& ref,
-                                              const std::function<void(platform::AudioFile&)>& block)
+std::int32_t CAudioFileIO::PerformAudioFileOperations(const CFileRef& ref,
+                                                      const std::function<void(platform::AudioFile&)>& block)
 {
     if (!ref.URL())
-        return;
+        return kStatusBadReference;
     std::int32_t status = kStatusOK;
     const auto file = platform::AudioFile::open(*ref.URL(), platform::AudioFile::Permission::readWrite, 0, &status);
     if (file && block)
         block(*file);
+    return status;
 }
 
 void CAudioFileIO::ForAllUUIDChunksPerformBlock(platform::AudioFile& file, const UUIDChunkBlock& block)

@@ -4,9 +4,11 @@
 #include "audiofile/AudioFileInfo.h"
 #include "audiofile/ChunkWalk.h"
 #include "audiofile/FileWindow.h"
+#include "loops/tagging/LoopTiming.h"
 
 #include <cstdint>
 #include <functional>
+#include <optional>
 
 /// What GetAudioFileInfo does, over a window that stays in use.
 std::int32_t DescribeAudioFile(FileWindow& file, AudioFileInfo& info);
@@ -23,6 +25,8 @@ void SetSampleRate(AudioFileInfo& info, double rate);
 void SetLinearPCM(AudioFileInfo& info, int bytesPerSample, bool isFloat, std::endian order, bool isUnsigned = false);
 /// Sets the sample data: `size` bytes at `offset`, of which those beyond the end of the file are not counted.
 void SetSampleData(AudioFileInfo& info, std::int64_t offset, std::uint64_t size);
+/// Sets the loop fields, behind all others.
+void SetLoopTiming(AudioFileInfo& info, const std::optional<tagging::LoopTiming>& timing);
 
 /// Calls `visit(const ChkHeader&, std::int64_t bodyOffset)` for each chunk of a RIFF-family or FORM container until it
 /// returns false. The container's size is not trusted: the walk goes on to the end of the file.

@@ -38,6 +38,15 @@ public:
         return readSome(to, position, count) == count ? kStatusOK : kStatusEndOfFile;
     }
 
+    /// Copies what may be longer than a piece; the number of bytes that were there.
+    std::size_t readPieces(std::byte* to, std::int64_t position, std::size_t count)
+    {
+        std::size_t done = 0;
+        for (std::size_t got = 1; done < count && got > 0; done += got)
+            got = readSome(to + done, position + static_cast<std::int64_t>(done), std::min(count - done, kNextSize));
+        return done;
+    }
+
 private:
     static constexpr std::size_t kStartSize = 4096; // most headers end within it, also those padded to a page
     static constexpr std::size_t kNextSize = 2048;  // a chunk or two behind the samples

@@ -1,12 +1,10 @@
 // The CAF side of the combined tags: pairs of texts.
 #include "loops/VireoLoopCombinedTagsChunkDataTypes.h"
 #include "loops/tagging/CAFPayloads.h"
+#include "loops/tagging/LoopTiming.h"
 #include "platform/String.h"
-#include "platform/core/ByteReader.h"
 
 #include <algorithm>
-#include <charconv>
-#include <cstring>
 #include <set>
 
 using platform::Dictionary;
@@ -36,31 +34,6 @@ const std::string* firstOf(const SearchInfo& info, const char* key)
 {
     const auto found = info.find(key);
     return found == info.end() ? nullptr : &found->second.front();
-}
-
-/// The number that a text begins with; 0 when it begins with none, the nearest 32-bit number when it is larger.
-std::int64_t integerValue(std::string_view text)
-{
-    text.remove_prefix(std::min(text.find_first_not_of(" \t"), text.size()));
-    if (text.starts_with('+'))
-        text.remove_prefix(1);
-    std::int32_t number = 0;
-    const auto result = std::from_chars(text.data(), text.data() + text.size(), number);
-    if (result.ec == std::errc::result_out_of_range)
-        return text.starts_with('-') ? INT32_MIN : INT32_MAX;
-    return number;
-}
-
-/// Top and bottom of a signature such as "6/8"; zeros when it is none.
-std::pair<std::int64_t, std::int64_t> signatureIn(const SearchInfo& info)
-{
-    const std::string* text = firstOf(info, "time signature");
-    if (text == nullptr || text->size() < 3)
-        return {0, 0};
-    const auto parts = split(*text, '/');
-    if (parts.size() != 2)
-        return {0, 0};
-    return {integerValue(parts[0]), integerValue(parts[1])};
 }
 
 std::int64_t numberFor(const Dictionary& tags, const char* key)
@@ -104,23 +77,12 @@ void addTexts(const Dictionary& tags, tagging::StringPairs& strings)
 SearchInfo VireoLoopCombinedTagsChunkDataTypes::extractSearchInfoFromData(BytesView payload)
 {
     SearchInfo info;
-    ByteReader reader(payload);
-    const auto count = reader.read<std::uint32_t>();
-    std::string_view rest = textOf(reader.rest());
-    // A text ends at its NUL, or with the data.
-    const auto nextText = [&rest] {
-        const std::string_view text = rest.substr(0, rest.find('\0'));
-        rest.remove_prefix(std::min(text.size() + 1, rest.size()));
-        return platform::String::fromUTF8(text);
-    };
-    for (std::uint32_t i = 0; i < count && !rest.empty(); ++i) {
-        const platform::String key = nextText();
-        if (rest.empty())
-            break; // a key without a value
-        const platform::String value = nextText();
+    tagging::ForEachCAFInfoString(payload, [&](std::string_view keyText, std::string_view valueText) {
+        const platform::String key = platform::String::fromUTF8(keyText);
+        const platform::String value = platform::String::fromUTF8(valueText);
         if (key && value)
             info[key.utf8()] = split(value.utf8(), ',');
-    }
+    });
     return info;
 }
 
@@ -160,8 +122,9 @@ Dictionary VireoLoopCombinedTagsChunkDataTypes::combinedTagsChunkDataDictionaryF
     }
 
     const std::string* beats = firstOf(info, "beat count");
-    const std::int64_t beatCount = beats != nullptr ? integerValue(*beats) : 0;
-    const auto [top, bottom] = signatureIn(info);
+    const std::int32_t beatCount = beats != nullptr ? tagging::NumberAtStartOf(*beats) : 0;
+    const std::string* signature = firstOf(info, "time signature");
+    const auto [top, bottom] = tagging::TimeSignatureIn(signature != nullptr ? *signature : "");
     tags[VireoLoopCombinedTagsChunkDataMidiRootNoteKey] = rootNoteKeyFromCafDict(info);
     tags[VireoLoopCombinedTagsChunkDataKeyType] = keyTypeFromCafDict(info);
     tags[VireoLoopCombinedTagsChunkDataBeatCountKey] = beatCount;

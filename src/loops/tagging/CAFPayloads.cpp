@@ -1,6 +1,7 @@
 #include "loops/tagging/CAFPayloads.h"
 
 #include "loops/tagging/Chunks.h"
+#include "platform/core/ByteReader.h"
 #include "platform/core/ByteWriter.h"
 
 #include <algorithm>
@@ -51,6 +52,25 @@ std::optional<Bytes> dataBehindUUID(FourCC chunkID, BytesView data)
 }
 
 } // namespace
+
+void tagging::ForEachCAFInfoString(BytesView payload,
+                                   const std::function<void(std::string_view key, std::string_view value)>& visit)
+{
+    ByteReader reader(payload);
+    const auto count = reader.read<std::uint32_t>();
+    std::string_view rest = textOf(reader.rest());
+    const auto nextText = [&rest] {
+        const std::string_view text = rest.substr(0, rest.find('\0'));
+        rest.remove_prefix(std::min(text.size() + 1, rest.size()));
+        return text;
+    };
+    for (std::uint32_t i = 0; i < count && !rest.empty(); ++i) {
+        const std::string_view key = nextText();
+        if (rest.empty())
+            return; // a key without a value
+        visit(key, nextText());
+    }
+}
 
 std::optional<Bytes> CAFInfoStringsData(const tagging::StringPairs& strings)
 {

@@ -1,17 +1,24 @@
-// Builders of what the suite's chunks carry in CAF files: string pairs, transients, and data behind a UUID.
+// What the suite's chunks carry in CAF files, built: string pairs (read too), transients, and data behind a UUID.
 #pragma once
 
 #include "loops/tagging/ChunkIDs.h"
 #include "platform/core/Bytes.h"
 
 #include <cstdint>
+#include <functional>
 #include <map>
 #include <optional>
 #include <string>
+#include <string_view>
 
 namespace tagging {
 /// Texts in UTF-8; one that holds a NUL ends there, as the pairs on disk do.
 using StringPairs = std::map<std::string, std::string>;
+
+/// Calls `visit` for each pair of such a payload that is there, whatever its count claims; a text ends at its NUL, or
+/// with the data. The texts may be anything but NUL.
+void ForEachCAFInfoString(BytesView payload,
+                          const std::function<void(std::string_view key, std::string_view value)>& visit);
 } // namespace tagging
 
 // Each returns null when memory is short.

@@ -1,0 +1,171 @@
+// What opening a file tells of the loop, and the frame positions of its transients, stored without the object layer.
+#include "audiofile/AudioFileLimits.h"
+#include "audiofile/CAudioFileIO.h"
+#include "loops/VireoLoopTransients.h"
+#include "loops/tagging/CAFPayloads.h"
+#include "loops/tagging/Chunks.h"
+#include "support/ContainerBuilder.h"
+#include "support/Hex.h"
+#include "support/TemporaryFolder.h"
+
+#include <gtest/gtest.h>
+
+namespace {
+
+constexpr std::uint32_t kFrames = 22050;
+constexpr std::size_t kSampleBytes = 2 * kFrames; // half a second at 44.1 kHz, mono, 16 bits
+
+Bytes basicTagging(std::int32_t beats, std::int16_t fileType)
+{
+    tagging::BasicTaggingChunk chunk;
+    chunk.beatCount = beats;
+    chunk.fileType = fileType;
+    tagging::SwapBasicTaggingChunkToBig(&chunk);
+    const BytesView bytes = std::as_bytes(std::span(&chunk, 1));
+    return {bytes.begin(), bytes.end()};
+}
+
+Bytes cafTagging(const tagging::StringPairs& pairs)
+{
+    return *CAFBasicUUIDChunkData(pairs);
+}
+
+AudioFileInfo infoOf(const ContainerBuilder& builder)
+{
+    CAudioFileIO file;
+    EXPECT_EQ(openInMemory(file, builder.bytes()), kStatusOK);
+    return file.Info();
+}
+
+AudioFileInfo aiffInfo(BytesView tagging)
+{
+    ContainerBuilder builder("FORM", "AIFF");
+    return infoOf(builder.format(kFrames).chunk("SSND", 8 + kSampleBytes).chunk("basc", tagging));
+}
+
+AudioFileInfo cafInfo(BytesView tagging)
+{
+    ContainerBuilder builder("caff");
+    builder.format().chunk("data", 4 + kSampleBytes);
+    return infoOf(builder.chunk("uuid", std::string(16, 'x') + "other").chunk("uuid", tagging));
+}
+
+TEST(LoopTiming, OpeningAFileTellsOfItsLoop)
+{
+    struct Case {
+        const char* what;
+        AudioFileInfo info;
+        float beats;
+        int timing, loops;
+        float tempo;
+    };
+    const Bytes emptyTagging = cafTagging({});
+    Bytes truncated = basicTagging(8, 1);
+    truncated.pop_back();
+    std::string manyDescriptors = "a";
+    for (int i = 0; i < 3000; ++i)
+        manyDescriptors += ",b";
+    const Case cases[] = {
+        {"AIFF loop", aiffInfo(basicTagging(2, 1)), 2, 1, 1, 240},
+        {"AIFF one-shot", aiffInfo(basicTagging(0, 2)), 0, 1, 0, 0},
+        {"AIFF with a count below 0", aiffInfo(basicTagging(-5, 1)), 0, 1, 1, 0},
+        {"AIFF with 81 bytes", aiffInfo(truncated), 0, 0, 0, 0},
+        {"CAF loop", cafInfo(cafTagging({{"beat count", "2"}, {"time signature", "4/4"}})), 2, 1, 1, 240},
+        {"CAF without a signature", cafInfo(cafTagging({{"beat count", "2"}})), 2, 1, 0, 240},
+        {"CAF, the count behind 6 KB of text",
+         cafInfo(cafTagging({{"a descriptors", manyDescriptors}, {"beat count", "2"}})), 2, 1, 0, 240},
+        {"CAF with a number too large", cafInfo(cafTagging({{"beat count", "99999999999"}})), 2147483648.F, 1, 0,
+         257698037760.F},
+        {"CAF, a UUID and no more", cafInfo(BytesView(emptyTagging).first(16)), 0, 0, 0, 0},
+    };
+    for (const Case& expected : cases) {
+        SCOPED_TRACE(expected.what);
+        EXPECT_EQ(expected.info.frames, std::int64_t{kFrames});
+        EXPECT_EQ(expected.info.beatCount, expected.beats);
+        EXPECT_EQ(expected.info.timingFlag, expected.timing);
+        EXPECT_EQ(expected.info.loopCount, expected.loops);
+        EXPECT_FLOAT_EQ(expected.info.loopValue, expected.tempo);
+    }
+    EXPECT_EQ(cases[0].info.VireoLoopTempo(), 240U * 5000);
+    EXPECT_EQ(CalculateBeatCountForFile(&cases[1].info, 1, 0), 0);
+}
+
+TEST(LoopTiming, AChunkAheadOfTheSamplesCountsToo)
+{
+    ContainerBuilder builder("FORM", "AIFF");
+    builder.chunk("basc", basicTagging(2, 1)).chunk("basc", basicTagging(4, 1));
+    EXPECT_EQ(infoOf(builder.format(kFrames).chunk("SSND", 8 + kSampleBytes)).beatCount, 2);
+}
+
+TEST(LoopTransients, InAIFFKeepWhatStandsAheadOfTheCount)
+{
+    // version, percentage, division, reserved, time, 15 reserved words, a count, a record
+    const std::string ahead = "0002"
+                              "0032"
+                              "0004"
+                              "0000"
+                              "5f5e1000" +
+                              std::string(15 * 8, 'a');
+    const std::string record = "0007"
+                               "0000"
+                               "00000010" +
+                               std::string(32, '0');
+    ContainerBuilder builder("FORM", "AIFF");
+    builder.format(4).chunk("trns", fromHex(ahead + "00000001" + record)).chunk("SSND", 16).chunk("NAME", "after");
+    CAudioFileIO file;
+    ASSERT_EQ(openInMemory(file, builder.bytes()), kStatusOK);
+    const std::int64_t positions[] = {0, 0x1'0000'0005, -1};
+    ASSERT_TRUE(file.ReplaceVireoLoopTransients(positions, 3));
+    const auto expected = [](const char* frame) { return "00010000" + (frame + std::string(32, '0')); };
+    EXPECT_EQ(toHex(*file.FindChunk(fourCC("trns"))),
+              ahead + "00000003" + expected("00000000") + expected("00000005") + expected("ffffffff"));
+    ASSERT_TRUE(file.ReplaceVireoLoopTransients(nullptr, 0));
+    EXPECT_EQ(toHex(*file.FindChunk(fourCC("trns"))), ahead + "00000000");
+    EXPECT_EQ(file.Info().frames, 4);
+    EXPECT_EQ(listing(file), "COMM:18 free:100 SSND:16 NAME:5 trns:76");
+}
+
+TEST(LoopTransients, InAIFFNeedAChunkToReplace)
+{
+    const std::int64_t position = 1;
+    for (const std::size_t size : {std::size_t{0}, std::size_t{75}}) {
+        ContainerBuilder builder("FORM", "AIFF");
+        builder.format(4).chunk("SSND", 16);
+        if (size > 0)
+            builder.chunk("trns", size);
+        const Bytes before = builder.bytes();
+        CAudioFileIO file;
+        ASSERT_EQ(openInMemory(file, before), kStatusOK);
+        EXPECT_FALSE(file.ReplaceVireoLoopTransients(&position, 1));
+        EXPECT_EQ(toHex(contentOf(file)), toHex(before));
+    }
+    CAudioFileIO file;
+    ASSERT_EQ(openInMemory(file, ContainerBuilder("FORM", "AIFF").format(4).chunk("trns", 76).bytes()), kStatusOK);
+    EXPECT_FALSE(file.ReplaceVireoLoopTransients(&position, -1));
+    EXPECT_FALSE(file.ReplaceVireoLoopTransients(&position, 178'956'968));
+    EXPECT_FALSE(file.ReplaceVireoLoopTransients(nullptr, 1));
+}
+
+TEST(LoopTransients, InCAFReplaceTheItemOfTheirUUID)
+{
+    TemporaryFolder folder;
+    const std::string path =
+        folder.write("a.caf", ContainerBuilder("caff").format().chunk("data", 12).chunk("info", "abcd").bytes());
+    const CFileRef ref(path.c_str(), false);
+    const std::int64_t positions[] = {5, 0x1'0000'0000};
+    EXPECT_EQ(WriteCAFTransientChunk(ref, positions, 2), kStatusOK);
+    EXPECT_EQ(WriteCAFTransientChunk(ref, positions, 1), kStatusOK);
+    CAudioFileIO file;
+    ASSERT_EQ(file.Open(ref, 0), kStatusOK);
+    EXPECT_EQ(toHex(*file.FindChunk(fourCC("uuid"))), toHex(*CAFTransientUUIDChunkData(positions, 1)));
+
+    EXPECT_EQ(WriteCAFTransientChunk(CFileRef((folder / "none.caf").c_str(), false), positions, 1),
+              kStatusFileNotFound);
+    const Bytes aiff = ContainerBuilder("FORM", "AIFF").format(4).chunk("SSND", 16).bytes();
+    const std::string other = folder.write("a.aiff", aiff);
+    EXPECT_EQ(WriteCAFTransientChunk(CFileRef(other.c_str(), false), positions, 1), kStatusParameterError);
+    EXPECT_EQ(readFile(other), aiff);
+    EXPECT_EQ(WriteCAFTransientChunk(ref, positions, INT64_MAX), kStatusParameterError);
+}
+
+} // namespace

@@ -1,140 +1,39 @@
 // Scanning a folder of loops: every file is opened from its path, its chunks are listed, one is read, the file closed.
 // Beside it what cannot be avoided (open, one read of 16 KiB, close), and the same work through libsndfile.
+#include "LoopFiles.h"
 #include "audiofile/CAudioFileIO.h"
-#include "platform/core/ByteWriter.h"
 
 #include <benchmark/benchmark.h>
-
-#include <fcntl.h>
 #include <sndfile.h>
-#include <unistd.h>
 
 #include <array>
-#include <cstdlib>
-#include <ctime>
-#include <filesystem>
-#include <fstream>
-#include <string>
-#include <vector>
 
 namespace {
 
 constexpr int kFilesOfAKind = 2000;
-constexpr std::size_t kFileSize = 64 * 1024;
-constexpr std::size_t kSampleBytes = 60 * 1024;
-constexpr std::size_t kChunks = 10;
 constexpr FourCC kRead = fourCC("basc"); // the chunk that is read, behind the samples
 constexpr std::size_t kReadSize = 82;
 
-struct ChunkSize {
-    const char (&id)[5];
-    std::size_t size;
-};
-
-void putChunk(ByteWriter& out, FourCC id, BytesView body)
+/// The files, half of them WAVE, half AIFF.
+const std::vector<std::string>& loopPaths()
 {
-    out.writeFourCC(id);
-    out.write(static_cast<std::uint32_t>(body.size()));
-    out.write(body);
-    out.writeZeros(body.size() & 1);
-}
-
-/// A container of `kFileSize` bytes: the format, the chunks, the last of them as long as it takes.
-Bytes container(FourCC id, FourCC formType, std::endian order, FourCC formatId, const Bytes& format,
-                const std::array<ChunkSize, kChunks - 1>& chunks)
-{
-    ByteWriter out(order);
-    out.writeFourCC(id);
-    out.write(static_cast<std::uint32_t>(kFileSize - 8));
-    out.writeFourCC(formType);
-    putChunk(out, formatId, format);
-    for (const ChunkSize& chunk : chunks)
-        putChunk(out, fourCC(chunk.id), Bytes(chunk.size > 0 ? chunk.size : kFileSize - out.size() - 8));
-    return out.take();
-}
-
-Bytes wave()
-{
-    ByteWriter format(std::endian::little);
-    for (const int field : {1, 2, 44100, 0, 176400 & 0xFFFF, 176400 >> 16, 4, 16})
-        format.write(static_cast<std::uint16_t>(field));
-    return container(kRIFF, kWAVE, std::endian::little, fourCC("fmt "), format.take(),
-                     {{{"LIST", 120},
-                       {"bext", 602},
-                       {"cue ", 28},
-                       {"data", kSampleBytes},
-                       {"smpl", 60},
-                       {"inst", 7},
-                       {"basc", kReadSize},
-                       {"cate", 210},
-                       {"LGWV", 0}}});
-}
-
-Bytes aiff()
-{
-    ByteWriter format;
-    format.write<std::uint16_t>(2);
-    format.write<std::uint32_t>((kSampleBytes - 8) / 4);
-    format.write<std::uint16_t>(16);
-    format.write<std::uint16_t>(0x400E); // 44100 as an 80-bit extended float
-    format.write<std::uint64_t>(0xAC44000000000000);
-    return container(kFORM, kAIFF, std::endian::big, fourCC("COMM"), format.take(),
-                     {{{"NAME", 21},
-                       {"ANNO", 500},
-                       {"APPL", 128},
-                       {"SSND", kSampleBytes},
-                       {"MARK", 2},
-                       {"trns", 300},
-                       {"basc", kReadSize},
-                       {"cate", 210},
-                       {"LGWV", 0}}});
-}
-
-/// The files, in a folder that is removed when the process ends.
-class Loops {
-public:
-    static const std::vector<std::string>& paths()
-    {
-        static const Loops loops;
-        return loops.paths_;
-    }
-
-private:
-    Loops()
-    {
-        std::string pattern = std::filesystem::temp_directory_path() / "ktfiles-bench-XXXXXX";
-        if (mkdtemp(pattern.data()) == nullptr)
-            std::abort();
-        folder_ = pattern;
+    static const BenchFolder folder;
+    static const std::vector<std::string> paths = [] {
+        std::vector<std::string> made;
         for (int i = 0; i < kFilesOfAKind; ++i) {
-            add("loop" + std::to_string(i) + ".wav", wave());
-            add("loop" + std::to_string(i) + ".aif", aiff());
+            made.push_back(folder.write("loop" + std::to_string(i) + ".wav", waveLoop()));
+            made.push_back(folder.write("loop" + std::to_string(i) + ".aif", aiffLoop()));
         }
-    }
-    ~Loops() { std::filesystem::remove_all(folder_); }
-
-    void add(const std::string& name, const Bytes& content)
-    {
-        paths_.push_back(folder_ / name);
-        std::ofstream(paths_.back(), std::ios::binary)
-            .write(reinterpret_cast<const char*>(content.data()), static_cast<std::streamsize>(content.size()));
-        if (content.size() != kFileSize)
-            std::abort();
-    }
-
-    std::filesystem::path folder_;
-    std::vector<std::string> paths_;
-};
+        return made;
+    }();
+    return paths;
+}
 
 // Each returns the bytes of the chunk that it read.
 
 std::size_t touch(const std::string& path)
 {
-    std::array<char, 16 * 1024> start;
-    const int descriptor = open(path.c_str(), O_RDONLY | O_CLOEXEC);
-    const ssize_t got = pread(descriptor, start.data(), start.size(), 0);
-    close(descriptor);
-    return got == ssize_t{start.size()} ? kReadSize : 0;
+    return openReadClose(path) ? kReadSize : 0;
 }
 
 std::size_t scan(const std::string& path)
@@ -145,7 +44,7 @@ std::size_t scan(const std::string& path)
     std::size_t chunks = 0;
     file.ForEachChunk([&](const ChunkEntry&) { return ++chunks, true; });
     CChunkData chunk;
-    return file.FindChunk(kRead, chunk) == 1 && chunks == kChunks ? static_cast<std::size_t>(chunk.size) : 0;
+    return file.FindChunk(kRead, chunk) == 1 && chunks == kLoopChunks ? static_cast<std::size_t>(chunk.size) : 0;
 }
 
 std::size_t scanWithSndfile(const std::string& path)
@@ -162,14 +61,7 @@ std::size_t scanWithSndfile(const std::string& path)
     chunk = {"basc", 4, body.size(), body.data()};
     const bool read = sf_get_chunk_data(sf_get_chunk_iterator(file, &chunk), &chunk) == SF_ERR_NO_ERROR;
     sf_close(file);
-    return read && chunks == kChunks + 1 ? chunk.datalen : 0; // it counts the container too
-}
-
-double cpuSeconds()
-{
-    timespec now{};
-    clock_gettime(CLOCK_PROCESS_CPUTIME_ID, &now);
-    return static_cast<double>(now.tv_sec) + static_cast<double>(now.tv_nsec) * 1e-9;
+    return read && chunks == kLoopChunks + 1 ? chunk.datalen : 0; // it counts the container too
 }
 
 /// The processor time of one pass over all files.
@@ -177,7 +69,7 @@ template <class Road>
 double pass(benchmark::State& state, const char* name, Road road)
 {
     const double start = cpuSeconds();
-    for (const std::string& path : Loops::paths()) {
+    for (const std::string& path : loopPaths()) {
         if (road(path) != kReadSize)
             state.SkipWithError(name);
     }
@@ -188,7 +80,7 @@ double pass(benchmark::State& state, const char* name, Road road)
 /// own.
 void ScanLoops(benchmark::State& state)
 {
-    const auto files = static_cast<double>(Loops::paths().size());
+    const auto files = static_cast<double>(loopPaths().size());
     double bare = 0, ours = 0, sndfile = 0;
     pass(state, "open, read, close failed", touch);
     for (auto _ : state) {

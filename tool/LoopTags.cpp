@@ -8,7 +8,9 @@
 
 #include <nlohmann/json.hpp>
 
+#include <algorithm>
 #include <cmath>
+#include <cstring>
 #include <filesystem>
 
 using platform::AudioFile;
@@ -48,14 +50,24 @@ std::optional<std::uint32_t> sizeOf(const VireoLoopBaseChunk& chunk, AudioFile& 
     return byUUID ? size - static_cast<std::uint32_t>(tagging::kUUIDSize) : size;
 }
 
+// An empty chunk of each kind that is carried as it is.
+VireoLoopChunkList carriedKinds()
+{
+    VireoLoopChunkList kinds = VireoLoopChunks::Empty();
+    std::erase_if(kinds, [](const auto& chunk) {
+        return dynamic_cast<const VireoLoopGenericChunkData*>(&chunk->chunkData()) == nullptr ||
+               dynamic_cast<const VireoLoopCombinedTagsChunkData*>(&chunk->chunkData()) != nullptr;
+    });
+    return kinds;
+}
+
 std::vector<LoopTags::Chunk> carriedChunks(AudioFile& file, FourCC fileType)
 {
+    static const VireoLoopChunkList kinds = carriedKinds(); // never changed: the threads of a scan share it
     std::vector<LoopTags::Chunk> found;
-    for (const auto& chunk : VireoLoopChunks::Empty())
-        if (dynamic_cast<const VireoLoopGenericChunkData*>(&chunk->chunkData()) != nullptr &&
-            dynamic_cast<const VireoLoopCombinedTagsChunkData*>(&chunk->chunkData()) == nullptr)
-            if (const auto size = sizeOf(*chunk, file, fileType))
-                found.push_back({carriedChunkName(*chunk), *size});
+    for (const auto& chunk : kinds)
+        if (const auto size = sizeOf(*chunk, file, fileType))
+            found.push_back({carriedChunkName(*chunk), *size});
     return found;
 }
 
@@ -102,6 +114,49 @@ std::string chunksText(const LoopTags& tags)
     return text;
 }
 
+std::string tempoText(const LoopTags& tags)
+{
+    const double tempo = tags.tempo();
+    return tempo > 0 ? fmt::format("{:.10g}", std::round(tempo * 100) / 100) : "";
+}
+
+std::string kindText(const LoopTags& tags)
+{
+    const std::int64_t type = tags.number(VireoLoopCombinedTagsChunkDataFileTypeKey);
+    return type == 1 ? "loop" : type == 2 ? "not a loop" : numberText(type);
+}
+
+template <const char* const& key>
+std::string text(const LoopTags& tags)
+{
+    return tags.text(key);
+}
+
+// What is shown of a loop, in order.
+struct ShownTag {
+    const char* name;
+    const char* label;
+    std::string (*text)(const LoopTags& tags);
+};
+const ShownTag kShownTags[] = {
+    {"tempo", "Tempo", tempoText},
+    {"beatCount", "Beats",
+     [](const LoopTags& tags) { return numberText(tags.number(VireoLoopCombinedTagsChunkDataBeatCountKey)); }},
+    {"key", "Key", keyText},
+    {"signature", "Signature", signatureText},
+    {"loopFileType", "Kind", kindText},
+    {"instrumentType", "Category", text<VireoLoopCombinedTagsChunkDataInstrumentTypeKey>},
+    {"instrumentSubType", "Sub-category", text<VireoLoopCombinedTagsChunkDataInstrumentSubTypeKey>},
+    {"genre", "Genre", text<VireoLoopCombinedTagsChunkDataGenreKey>},
+    {"descriptors", "Descriptors", descriptorsText},
+    {"title", "Title", text<VireoLoopFileInfoChunkDataTitleKey>},
+    {"artist", "Artist", text<VireoLoopFileInfoChunkDataArtistKey>},
+    {"copyright", "Copyright", text<VireoLoopFileInfoChunkDataCopyrightKey>},
+    {"comments", "Comments", text<VireoLoopFileInfoChunkDataCommentsKey>},
+    {"transients", "Transients", [](const LoopTags& tags) { return numberText(std::ssize(tags.transients)); }},
+    {"chunks", "Chunks", chunksText},
+};
+
 nlohmann::ordered_json jsonValue(const platform::Value& value)
 {
     if (const auto* number = value.get<std::int64_t>())
@@ -145,14 +200,15 @@ const char* loopContainerName(FourCC fileType)
 
 VireoLoopChunksManager openLoopFile(const std::string& path, AudioFile::Permission permission)
 {
-    requireRegularFile(path);
     std::error_code error;
-    const std::filesystem::path absolute = std::filesystem::absolute(path, error);
+    const std::string absolute = path.starts_with('/') ? path : std::filesystem::absolute(path, error).string();
     const platform::String location = platform::String::fromFileSystemRepresentation(absolute.c_str());
     if (location.isNull())
         throw Failure("its path is not valid UTF-8");
     VireoLoopChunksManager manager(platform::URL::createWithFileSystemPath(location, platform::PathStyle::posix, false),
                                    permission);
+    if (manager.status() != kStatusOK)
+        requireRegularFile(path); // says best what is wrong with it
     if (manager.status() == kStatusParameterError)
         throw NoLoopContainer("is no AIFF or CAF file", false);
     requireOK(manager.status());
@@ -162,6 +218,27 @@ VireoLoopChunksManager openLoopFile(const std::string& path, AudioFile::Permissi
                                           type == kWAVE ? "a WAVE" : "an " + fourCCText(type)),
                               true);
     return manager;
+}
+
+std::vector<LoopTags::Chunk> loopChunksOf(VireoLoopChunksManager& manager)
+{
+    AudioFile& file = *manager.audioFile();
+    const bool aiff = manager.audioFileTypeID() == kAIFF;
+    std::vector<LoopTags::Chunk> found = carriedChunks(file, manager.audioFileTypeID());
+    for (const std::unique_ptr<VireoLoopBaseChunk>& chunk : VireoLoopChunks::Empty())
+        if (chunk->aifChunkID() == tagging::kBasicTagging || chunk->aifChunkID() == tagging::kTransients)
+            if (const auto size = sizeOf(*chunk, file, manager.audioFileTypeID()))
+                found.push_back({carriedChunkName(*chunk), *size});
+    std::uint32_t size = 0;
+    for (const FourCC id : {tagging::kCategories, fourCC("NAME"), fourCC("AUTH"), fourCC("(c) "), fourCC("COMT")})
+        if (aiff && file.userDataSize(id, 0, size) == kStatusOK)
+            found.push_back({fourCCText(id), size});
+    platform::Dictionary information;
+    if (!aiff && file.information(information) == kStatusOK)
+        for (const char* key : {"title", "artist", "copyright", "comments"})
+            if (const auto* text = platform::find<std::string>(information, key))
+                found.push_back({key, static_cast<std::uint32_t>(text->size())});
+    return found;
 }
 
 LoopTags readLoopTags(const std::string& path)
@@ -174,8 +251,8 @@ LoopTags readLoopTags(const std::string& path)
     manager.readChunks(list);
     LoopTags tags;
     tags.fileType = manager.audioFileTypeID();
-    tags.info = info.fileInfo().dataDictionary();
-    tags.combined = combined.tags().dataDictionary();
+    tags.info = std::move(info.fileInfo()).dataDictionary();
+    tags.combined = std::move(combined.tags()).dataDictionary();
     tags.transients = transients.transients().transients();
     readLength(*manager.audioFile(), tags);
     tags.chunks = carriedChunks(*manager.audioFile(), tags.fileType);
@@ -184,29 +261,18 @@ LoopTags readLoopTags(const std::string& path)
 
 std::vector<TagLine> tagLines(const LoopTags& tags)
 {
-    const std::int64_t type = tags.number(VireoLoopCombinedTagsChunkDataFileTypeKey);
-    const double tempo = tags.tempo();
-    std::vector<TagLine> lines{
-        {"tempo", "Tempo", tempo > 0 ? fmt::format("{:.10g}", std::round(tempo * 100) / 100) : ""},
-        {"beatCount", "Beats", numberText(tags.number(VireoLoopCombinedTagsChunkDataBeatCountKey))},
-        {"key", "Key", keyText(tags)},
-        {"signature", "Signature", signatureText(tags)},
-        {"loopFileType", "Kind",
-         type == 1   ? "loop"
-         : type == 2 ? "not a loop"
-                     : numberText(type)},
-        {"instrumentType", "Category", tags.text(VireoLoopCombinedTagsChunkDataInstrumentTypeKey)},
-        {"instrumentSubType", "Sub-category", tags.text(VireoLoopCombinedTagsChunkDataInstrumentSubTypeKey)},
-        {"genre", "Genre", tags.text(VireoLoopCombinedTagsChunkDataGenreKey)},
-        {"descriptors", "Descriptors", descriptorsText(tags)},
-        {"title", "Title", tags.text(VireoLoopFileInfoChunkDataTitleKey)},
-        {"artist", "Artist", tags.text(VireoLoopFileInfoChunkDataArtistKey)},
-        {"copyright", "Copyright", tags.text(VireoLoopFileInfoChunkDataCopyrightKey)},
-        {"comments", "Comments", tags.text(VireoLoopFileInfoChunkDataCommentsKey)},
-        {"transients", "Transients", numberText(std::ssize(tags.transients))},
-        {"chunks", "Chunks", chunksText(tags)}};
-    std::erase_if(lines, [](const TagLine& line) { return line.text.empty(); });
+    std::vector<TagLine> lines;
+    for (const ShownTag& shown : kShownTags)
+        if (std::string text = shown.text(tags); !text.empty())
+            lines.push_back({shown.name, shown.label, std::move(text)});
     return lines;
+}
+
+std::string tagText(const LoopTags& tags, const char* name)
+{
+    const auto shown = std::find_if(std::begin(kShownTags), std::end(kShownTags),
+                                    [&](const ShownTag& each) { return std::strcmp(each.name, name) == 0; });
+    return shown->text(tags);
 }
 
 nlohmann::ordered_json tagsWithoutTransients(const LoopTags& tags)

@@ -54,6 +54,9 @@ VireoLoopChunksManager openLoopFile(const std::string& path, platform::AudioFile
 /// Reads them, and of the chunks that are not interpreted only the sizes. Throws Failure.
 LoopTags readLoopTags(const std::string& path);
 
+/// The chunks of an open file that hold loop tags or are carried, whether they can be read or not.
+std::vector<LoopTags::Chunk> loopChunksOf(VireoLoopChunksManager& manager);
+
 /// One tag in words: its name on the command line, its label for people, and the value.
 struct TagLine {
     const char* name;
@@ -62,6 +65,8 @@ struct TagLine {
 };
 /// What is known of the tags, in a musician's order; texts are as in the file.
 std::vector<TagLine> tagLines(const LoopTags& tags);
+/// The text of one tag by its name, which must be one of theirs.
+std::string tagText(const LoopTags& tags, const char* name);
 
 /// "AIFF" or "CAF".
 const char* loopContainerName(FourCC fileType);

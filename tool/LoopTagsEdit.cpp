@@ -5,6 +5,7 @@
 #include "Terminal.h"
 #include "audiofile/ContainerHeaders.h"
 #include "loops/VireoLoopUserDataUtils.h"
+#include "loops/tagging/CAFPayloads.h"
 
 #include <algorithm>
 
@@ -76,6 +77,34 @@ bool writeChunk(VireoLoopChunksManager& manager, Fill fill)
     fill(*chunk);
     list.push_back(std::move(chunk));
     return list.front()->chunkData().isEmpty() ? manager.removeChunks(list) : manager.writeChunks(list);
+}
+
+// The pairs of a CAF file's basic tagging that are no tags of ours, which the library's writer leaves out.
+tagging::StringPairs otherPairs(platform::AudioFile& file)
+{
+    using Types = VireoLoopCombinedTagsChunkDataTypes;
+    constexpr std::string_view ours[] = {"beat count", "time signature", "key signature", "key type",
+                                         "category",   "subcategory",    "genre",         "descriptors"};
+    tagging::StringPairs others;
+    const auto payload = VireoLoopUUIDUserDataUtils::read(file, *chunkIDToCafChunkUUID(tagging::kBasicTagging));
+    for (const auto& [key, parts] : Types::extractSearchInfoFromData(payload.value_or(Bytes())))
+        if (std::find(std::begin(ours), std::end(ours), key) == std::end(ours))
+            others[key] = fmt::format("{}", fmt::join(parts, ","));
+    return others;
+}
+
+bool writeCAFTags(VireoLoopChunksManager& manager, const VireoLoopCombinedTagsChunkData& tags)
+{
+    using Types = VireoLoopCombinedTagsChunkDataTypes;
+    const auto payload = tags.cafDataRepresentation();
+    if (!payload)
+        return false;
+    tagging::StringPairs pairs = otherPairs(*manager.audioFile());
+    for (const auto& [key, parts] : Types::extractSearchInfoFromData(*payload))
+        pairs[key] = fmt::format("{}", fmt::join(parts, ","));
+    const auto merged = CAFInfoStringsData(pairs);
+    return merged && VireoLoopUUIDUserDataUtils::write(*manager.audioFile(),
+                                                       *chunkIDToCafChunkUUID(tagging::kBasicTagging), *merged);
 }
 
 bool writeAIFFInfo(VireoLoopChunksManager& manager, const Dictionary& changed, const std::vector<std::string>& gone)
@@ -248,10 +277,13 @@ Dictionary keptCombinedTags(const Dictionary& combined, FourCC fileType)
 bool writeCombinedTags(VireoLoopChunksManager& manager, const Dictionary& combined)
 {
     const FourCC type = manager.audioFileTypeID();
-    return writeChunk<VireoLoopCombinedTaggingChunk>(manager, [&](VireoLoopCombinedTaggingChunk& chunk) {
-        if (!isBlank(combined, type))
-            chunk.tags().setDataDictionary(combinedTagsFor(combined, type));
-    });
+    VireoLoopCombinedTagsChunkData tags;
+    if (!isBlank(combined, type))
+        tags.setDataDictionary(combinedTagsFor(combined, type));
+    if (type == kCaff && !tags.isEmpty())
+        return writeCAFTags(manager, tags);
+    return writeChunk<VireoLoopCombinedTaggingChunk>(
+        manager, [&](VireoLoopCombinedTaggingChunk& chunk) { chunk.tags() = tags; });
 }
 
 bool writeFileInfo(VireoLoopChunksManager& manager, const Dictionary& before, const Dictionary& after)

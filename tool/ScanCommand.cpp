@@ -13,7 +13,7 @@
 namespace {
 
 // Files travel in batches, which cost the threads less than one by one.
-constexpr std::size_t kBatch = 16;
+constexpr std::size_t kBatch = 64;
 constexpr unsigned kBatchesPerThread = 8;
 constexpr unsigned kMostThreads = 256;
 

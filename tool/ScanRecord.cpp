@@ -72,15 +72,11 @@ std::string csvLine(const std::string& path, const LoopTags& tags)
 }
 
 // The tags of `names`, made fit for one line of text.
-std::vector<std::string> cells(const LoopTags& tags, std::initializer_list<std::string_view> names)
+std::vector<std::string> cells(const LoopTags& tags, std::initializer_list<const char*> names)
 {
-    const auto lines = tagLines(tags);
     std::vector<std::string> row;
-    for (const std::string_view name : names) {
-        const auto found =
-            std::find_if(lines.begin(), lines.end(), [&](const TagLine& line) { return line.name == name; });
-        row.push_back(found == lines.end() ? "" : printable(found->text));
-    }
+    for (const char* name : names)
+        row.push_back(printable(tagText(tags, name)));
     return row;
 }
 

@@ -164,13 +164,18 @@ TagsPlan planAssignments(const LoopTags& before, const std::string& path, const 
     return plan;
 }
 
-TagsPlan planRemoval(const LoopTags& before)
+TagsPlan planRemoval(const LoopTags& before, const std::string& path)
 {
     TagsPlan plan;
     plan.after.fileType = before.fileType;
     plan.after.sampleRate = before.sampleRate;
     plan.after.frames = before.frames;
     plan.changes = differences(before, plan.after);
+    if (plan.changes.empty()) { // chunks that say nothing, or that cannot be read
+        VireoLoopChunksManager manager = openLoopFile(path, platform::AudioFile::Permission::read);
+        for (const LoopTags::Chunk& chunk : loopChunksOf(manager))
+            plan.changes.push_back({chunk.id, fmt::format("{} bytes", chunk.size), {}});
+    }
     plan.write = [](VireoLoopChunksManager& manager) { return manager.removeChunks(VireoLoopChunks::Empty()); };
     return plan;
 }
@@ -193,7 +198,7 @@ bool runRemove(const SetArguments& arguments, const OutputOptions& output)
 {
     const TagArguments parsed = parseKeys(arguments.words);
     const TagsEditor editor{"remove", "removed", "would remove", [&](const LoopTags& before, const std::string& path) {
-                                return parsed.assignments.empty() ? planRemoval(before)
+                                return parsed.assignments.empty() ? planRemoval(before, path)
                                                                   : planAssignments(before, path, parsed.assignments);
                             }};
     return editTags(parsed.files, editor, arguments.options, output);

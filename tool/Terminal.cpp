@@ -2,6 +2,7 @@
 
 #include <fmt/core.h>
 
+#include <algorithm>
 #include <clocale>
 #include <cstdlib>
 #include <cwchar>
@@ -14,6 +15,11 @@ namespace {
 // The next character of `text`, which is shortened by it; 0xFFFD for a byte that begins none.
 wchar_t takeCharacter(std::string_view& text)
 {
+    constexpr unsigned char firstBeyondASCII = 0x80;
+    if (const auto ascii = static_cast<unsigned char>(text.front()); ascii < firstBeyondASCII) {
+        text.remove_prefix(1);
+        return ascii;
+    }
     // Not the user's locale: file names are UTF-8 whatever that says, and widths must not depend on it.
     static const bool located = std::setlocale(LC_CTYPE, "C.UTF-8") != nullptr;
     wchar_t character = 0;
@@ -21,9 +27,9 @@ wchar_t takeCharacter(std::string_view& text)
     const std::size_t length = located ? std::mbrtowc(&character, text.data(), text.size(), &state) : 1;
     if (!located)
         character = static_cast<unsigned char>(text.front());
-    const bool good = length != 0 && length <= text.size();
+    const bool good = length <= text.size();
     text.remove_prefix(good ? length : 1);
-    return good || length == 0 ? character : L'\xFFFD';
+    return good ? character : L'\xFFFD';
 }
 
 } // namespace
@@ -51,6 +57,8 @@ int terminalColumns()
 
 std::string printable(std::string_view text)
 {
+    if (std::all_of(text.begin(), text.end(), [](char c) { return c >= ' ' && c <= '~'; }))
+        return std::string(text); // most are
     std::string result;
     while (!text.empty()) {
         const std::string_view before = text;

@@ -33,7 +33,12 @@ void FileInfoCafChunkReader::readChunk()
     Dictionary information;
     if (file_.information(information) != kStatusOK)
         return;
-    // The data object takes what it knows from the archive and leaves the rest.
+    // The data object takes what it knows from the archive; an archive holds UTF-8 only, which entries of others may
+    // not be.
+    std::erase_if(information, [](const auto& entry) {
+        const auto* text = entry.second.template get<std::string>();
+        return text == nullptr || !platform::String::fromUTF8(entry.first) || !platform::String::fromUTF8(*text);
+    });
     if (const auto archive = platform::archiveDictionary(information))
         chunk_.chunkData().setChunkData(*archive, fourCC("caff"));
 }
@@ -80,7 +85,7 @@ bool FileInfoAifChunkWriter::writeChunk()
         return false;
     for (const char* key : kKeys) {
         const auto part = Types::aifChunkDataPartFromAifChunkData(*archive, key);
-        if (part && !UserData::write(file_, Types::fileInfoTypeForKey(key), 0, *part))
+        if (part && !UserData::writeFirst(file_, Types::fileInfoTypeForKey(key), *part))
             return false;
     }
     return true;

@@ -20,7 +20,7 @@ bool GenericCafChunkWriter::writeChunk()
     if (!data)
         return false;
     return chunk_.cafChunkIsUUIDChunk() ? UUIDUserData::write(file_, *chunk_.cafChunkUUID(), *data)
-                                        : UserData::write(file_, chunk_.cafChunkID(), 0, *data);
+                                        : UserData::writeFirst(file_, chunk_.cafChunkID(), *data);
 }
 
 bool GenericCafChunkRemover::removeChunk()
@@ -42,7 +42,7 @@ bool GenericAifChunkWriter::writeChunk()
     if (chunk_.aifChunkID() == 0)
         return true; // a chunk of CAF files only
     const auto data = chunk_.chunkData().chunkDataForAudioFileType(fourCC("AIFF"));
-    return data && UserData::write(file_, chunk_.aifChunkID(), 0, *data);
+    return data && UserData::writeFirst(file_, chunk_.aifChunkID(), *data);
 }
 
 bool GenericAifChunkRemover::removeChunk()

@@ -24,4 +24,7 @@ public:
     /// readFromAIFData: and readFromCafData: — take what can be read and leave out the rest.
     virtual void readFromAIFData(BytesView) {}
     virtual void readFromCafData(BytesView) {}
+
+protected:
+    Bytes _internalChunkData; // Kept: opaque; the classes of the suite have fields of their own
 };

@@ -151,12 +151,17 @@ Bytes categoriesOf(const Dictionary& tags)
     return bytes;
 }
 
-Bytes archiveEntry(BytesView archive, const char* key)
+Bytes takeEntry(std::optional<Dictionary>& dictionary, const char* key)
 {
-    auto dictionary = platform::unarchiveDictionary(archive);
     const auto found = dictionary ? dictionary->find(key) : Dictionary::iterator();
     Bytes* bytes = dictionary && found != dictionary->end() ? found->second.get<Bytes>() : nullptr;
     return bytes != nullptr ? std::move(*bytes) : Bytes();
+}
+
+Bytes archiveEntry(BytesView archive, const char* key)
+{
+    auto dictionary = platform::unarchiveDictionary(archive);
+    return takeEntry(dictionary, key);
 }
 
 } // namespace
@@ -167,8 +172,9 @@ VireoLoopCombinedTagsChunkDataTypes::combinedTagsChunkDataDictionaryFromAifChunk
     if (archive.empty())
         return std::nullopt;
     Dictionary tags;
-    readBasicTagging(basicTaggingDataFromCombinedAidChunkData(archive), tags);
-    readCategories(categoryDataFromCombinedAidChunkData(archive), tags);
+    auto parts = platform::unarchiveDictionary(archive);
+    readBasicTagging(takeEntry(parts, VireoLoopCombinedBasicTaggingDataKey), tags);
+    readCategories(takeEntry(parts, VireoLoopCombinedCategoryDataKey), tags);
     return tags;
 }
 

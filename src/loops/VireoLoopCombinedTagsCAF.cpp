@@ -65,10 +65,12 @@ void addTexts(const Dictionary& tags, tagging::StringPairs& strings)
     const auto* descriptors = platform::find<platform::Array>(tags, VireoLoopCombinedTagsChunkDataDescriptorsKey);
     if (descriptors == nullptr)
         return;
-    std::string joined;
+    std::string joined, separator;
     for (const platform::Value& value : *descriptors)
-        if (const auto* text = value.get<std::string>())
-            (joined += joined.empty() ? "" : ",") += *text;
+        if (const auto* text = value.get<std::string>()) {
+            joined += separator + *text;
+            separator = ","; // ahead of the next one, even when this one is empty
+        }
     strings["descriptors"] = joined;
 }
 

@@ -15,7 +15,8 @@ public:
     void readFromCafData(BytesView data) override;
 
     /// Under the VireoLoopCombinedTagsChunkData keys.
-    const platform::Dictionary& dataDictionary() const { return _dataDictionary; }
+    const platform::Dictionary& dataDictionary() const& { return _dataDictionary; }
+    platform::Dictionary dataDictionary() && { return std::move(_dataDictionary); }
     void setDataDictionary(platform::Dictionary tags) { _dataDictionary = std::move(tags); }
 
 private:

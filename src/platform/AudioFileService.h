@@ -37,7 +37,9 @@ struct KT_EXPORT StreamDescription {
 };
 static_assert(sizeof(StreamDescription) == 40);
 
-/// An open audio file; the destructor closes it. Operations return 0 or a negative status code (core/Status.h).
+/// An open audio file; the destructor closes it. Operations return 0 or a negative status code (core/Status.h). Of a
+/// file that is open for reading the chunk headers are kept once read: what another writes meanwhile is seen when it is
+/// opened anew.
 ///
 /// User data are the blocks that a container carries beside the samples, named by a four-character type and, where a
 /// type occurs more than once, by their index in file order. Chunks that make up the container or describe the samples

@@ -134,6 +134,25 @@ TEST(CFileRef, ColonPathsAreReadInTheLocalEncoding)
     CFileRef::mLocalEncoding = platform::kTextEncodingWestern;
 }
 
+// Text that is not UTF-8, of an odd number of bytes, falls through to an encoding of two bytes each: one zero ends it.
+TEST(CFileRef, ColonPathsAreNotReadBeyondTheirZero)
+{
+    CFileRef::mLocalEncoding = platform::kTextEncodingUTF8;
+    for (const std::string_view path : {"Disk:\xFF\xFE", "\xFF", "Disk:a\xC3"})
+        for (const bool isDirectory : {false, true}) {
+            // On the heap, and no byte longer, so that a sanitizer sees what is read behind it.
+            const std::unique_ptr<char[]> exact(new char[path.size() + 1]);
+            *std::copy(path.begin(), path.end(), exact.get()) = '\0';
+            std::string behind(path);
+            behind += std::string("\0:elsewhere", 11);
+            CFileRef alone("/x", false), followed("/x", false);
+            EXPECT_EQ(alone.SetFromColonPath(exact.get(), isDirectory),
+                      followed.SetFromColonPath(behind.c_str(), isDirectory));
+            EXPECT_EQ(shown(alone), shown(followed)) << "what stands behind the zero counts";
+        }
+    CFileRef::mLocalEncoding = platform::kTextEncodingWestern;
+}
+
 TEST(CFileRef, IsBuiltFromItsOwnParts)
 {
     CFileRef ref("/a/b", false);

@@ -143,6 +143,8 @@ TEST(CombinedTags, VocabularyOfCAF)
     Dictionary noLoop = someTags();
     noLoop[VireoLoopCombinedTagsChunkDataFileTypeKey] = 2;
     EXPECT_EQ(toCAF(noLoop).count("time signature"), 0u);
+    EXPECT_EQ(toCAF({{VireoLoopCombinedTagsChunkDataDescriptorsKey, Array{"", "a"}}})["descriptors"],
+              (std::vector<std::string>{"", "a"})); // an empty one ahead keeps its comma
 }
 
 TEST(CombinedTags, PairsAreReadAsFarAsTheyGo)

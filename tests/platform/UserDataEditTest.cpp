@@ -1,11 +1,9 @@
 // Edits of user data that are cut short at each single call, and what becomes of files edited again and again.
 #include "AudioContainers.h"
-#include "platform/SystemCalls.h"
 #include "platform/core/Status.h"
-#include "support/FaultInjection.h"
+#include "support/FaultyDisk.h"
 
 #include <algorithm>
-#include <cerrno>
 #include <filesystem>
 #include <functional>
 #include <map>
@@ -15,55 +13,6 @@ using namespace platform;
 namespace {
 
 constexpr FourCC kItem = fourCC("uuid"); // the type that is edited; the others must not notice
-
-enum class Fault { none, once, onceAfterHalf, fromThereOn, fullAfterHalf };
-
-/// Counts the calls that change the file, and lets one of them, or all from there on, fail.
-struct FaultyDisk {
-    static inline int calls;
-    static inline int failing; // the number of the call
-    static inline Fault fault;
-    static inline SystemCalls real;
-    SystemCallGuard guard;
-
-    FaultyDisk(int call, Fault kind)
-    {
-        calls = 0;
-        failing = call;
-        fault = kind;
-        real = guard.real();
-        systemCalls().pwrite = write;
-        systemCalls().ftruncate = [](int descriptor, std::int64_t length) {
-            return fails() ? -1 : real.ftruncate(descriptor, length);
-        };
-        systemCalls().fsync = [](int) { return fails() ? -1 : 0; }; // no power is cut here, and a test has no time
-    }
-
-    static bool fails()
-    {
-        const int call = calls++;
-        const bool isOnce = fault == Fault::once || fault == Fault::onceAfterHalf;
-        if (fault == Fault::none || call < failing || (isOnce && call > failing))
-            return false;
-        errno = ENOSPC;
-        return true;
-    }
-
-    static std::int64_t write(int descriptor, const void* from, std::size_t count, std::int64_t position)
-    {
-        if (!fails())
-            return real.pwrite(descriptor, from, count, position);
-        FileStatus status;
-        real.status(descriptor, &status);
-        const bool isHeader = fault == Fault::fullAfterHalf && count <= 12; // the disk has these bytes already
-        if (calls - 1 == failing && !isHeader && (fault == Fault::onceAfterHalf || fault == Fault::fullAfterHalf)) {
-            real.pwrite(descriptor, from, count / 2, position);
-            if (count >= 2)
-                errno = EIO;
-        }
-        return -1;
-    }
-};
 
 std::vector<std::string> bodiesOf(const Chunks& chunks, FourCC id)
 {
@@ -354,4 +303,43 @@ TEST(UserDataEdit, ExtendingTheSamplesCutShortLeavesWhatWasThere)
                     EXPECT_EQ(walkContainer(readFile(path)).size(), 4u);
                 }
             }
+}
+
+// Filler of two odd chunks without pad bytes has an odd size, and a zero behind it passes for its own pad byte.
+TEST(UserDataEdit, MissingPadsAheadOfAnIdThatBeginsWithZero)
+{
+    TemporaryFolder folder;
+    Bytes bytes = buildContainer(fourCC("AIFF"), {formatChunk(fourCC("AIFF"))});
+    const Bytes tail = buildContainer(fourCC("AIFF"), {{1, "even"}, dataChunk(fourCC("AIFF"))});
+    std::string odd = std::string("note\0\0\0\7n", 9) + "nnnnnn" + std::string("uuid\0\0\0\0", 8);
+    for (const char byte : odd)
+        bytes.push_back(static_cast<std::byte>(byte));
+    bytes.insert(bytes.end(), tail.begin() + 12, tail.end());
+    storeBE(bytes.data() + 4, static_cast<std::uint32_t>(bytes.size() - 8));
+    for (const bool isNoteFirst : {false, true}) {
+        const std::string path = folder.write("file", bytes);
+        const auto file = openAudio(path);
+        ASSERT_EQ(file->removeUserData(isNoteFirst ? fourCC("note") : kItem, 0), 0);
+        ASSERT_EQ(setItem(*file, isNoteFirst ? kItem : fourCC("note"), 0, std::string(50, 'x')), 0);
+        std::string samples(16, '\0');
+        std::uint32_t count = 16;
+        EXPECT_EQ(openAudio(path, false)->readBytes(0, count, samples.data()), 0);
+        EXPECT_EQ(samples, testSamples);
+    }
+}
+
+// An id of zeros with a size beyond the end: put right, it would be all zeros, and nothing behind it would be found.
+TEST(UserDataEdit, NothingIsPutBehindAHeaderOfZerosThatEndsTheFile)
+{
+    for (const FourCC container : {fourCC("WAVE"), fourCC("AIFF"), fourCC("caff")}) {
+        TemporaryFolder folder;
+        const std::string path =
+            folder.write("file", buildContainer(container, {formatChunk(container), dataChunk(container), {0, ""}}));
+        Bytes bytes = readFile(path);
+        bytes[bytes.size() - 2] = std::byte{0x10}; // of its size
+        folder.write("file", bytes);
+        EXPECT_EQ(setItem(*openAudio(path), kItem, 0, "item"), kStatusIOError) << fourCCText(container);
+        EXPECT_EQ(itemsOf(*openAudio(path), kItem), std::vector<std::string>());
+        EXPECT_EQ(readFile(path), bytes);
+    }
 }

@@ -7,7 +7,7 @@ import struct
 import subprocess
 import unittest
 
-from command import MEDIA, CommandTest
+from command import MEDIA, CommandTest, caf
 
 SAMPLES = {"a.aiff": "tone-16.aiff", "a.caf": "pluck-24-le.caf"}
 PATCH = b"patch bytes"
@@ -107,10 +107,10 @@ class Edits(TagsTest):
     ALL = {"beatCount": 8, "midiRootNote": 54, "keyType": 1, "signatureTop": 12, "signatureBottom": 8,
            "loopFileType": 1, "instrumentType": "Bass", "instrumentSubType": "Electric", "genre": "Rock",
            "descriptors": ["Dry", "Grooving"], "title": "Tïtle", "artist": "An Artist", "copyright": "2026",
-           "comments": "Say: a=b, c", "transients": [{"type": 1, "frame": frame} for frame in (0, 1100, 2000)]}
+           "comments": "Say: a=b, c", "transients": [{"type": 1, "frame": frame} for frame in (0, 50, 99)]}
     ARGUMENTS = ["beatCount=8", "key=Gb", "mode=minor", "signature=12/8", "instrumentType=Bass",
                  "instrumentSubType=Electric", "genre=Rock", "descriptors=Grooving, Dry,Dry", "title=Tïtle",
-                 "artist=An Artist", "copyright=2026", "comments=Say: a=b, c", "transients=2000,0,1100"]
+                 "artist=An Artist", "copyright=2026", "comments=Say: a=b, c", "transients=99,0,50"]
 
     def without(self, shown, *keys):
         return {key: value for key, value in shown.items() if key not in ("path", "fileType", "tempo", *keys)}
@@ -190,6 +190,35 @@ class Edits(TagsTest):
             self.assertFalse(ids & {"basc", "cate", "trns", "CHST", "uuid", "NAME", "AUTH", "(c) ", "COMT"}, ids)
         self.assert_sound()
 
+    def test_chunks_that_cannot_be_read_are_removed(self):
+        uuids = {"trns": "0352811b9d5d42e1882d6af61a6b330c", "basc": "29819273b5bf4aefb78d62d1ef90bb2c"}
+        for chunks in ([(b"basc", BASIC[:40])], [(b"basc", bytes(82))], [(b"cate", category(b"Drums", version=3))],
+                       [(b"trns", b"short"), (b"AUTH", b"\xFF")], [(b"NAME", b"")]):
+            shutil.copy(MEDIA / "tone-16.aiff", self.folder / "a.aiff")
+            self.run_command("tags", "remove", "a.aiff")  # what its maker put there
+            clean = self.json("chunks", "a.aiff")["chunks"]
+            aiff_with(self.folder / "a.aiff", *chunks)
+            self.assertIn(chunks[0][0].decode(), self.run_command("tags", "remove", "a.aiff").stdout.decode())
+            self.assertEqual(self.json("chunks", "a.aiff")["chunks"], clean)
+            self.assertEqual(self.lines("tags", "remove", "a.aiff"), ["a.aiff: unchanged"])
+        for chunk_id, body in ((b"uuid", bytes.fromhex(uuids["trns"]) + b"short"), (b"info", b"\0\0\0\1title\0\xFF\0"),
+                               (b"uuid", bytes.fromhex(uuids["basc"]))):
+            self.write("b.caf", caf((chunk_id, body), (b"uuid", bytes(20))))
+            self.run_command("tags", "remove", "b.caf")
+            self.assertEqual([item["id"] for item in self.json("chunks", "b.caf")["chunks"] if item["id"] != "free"],
+                             ["desc", "uuid", "data"])
+        self.assert_sound()
+
+    def test_pairs_of_others_stay_in_caf(self):
+        basic = bytes.fromhex("29819273b5bf4aefb78d62d1ef90bb2c")
+        pairs = b"\0\0\0\3" + b"genre\0Rock\0" + b"tempo\x00120,5\0" + b"beat count\x008\0"
+        self.write("b.caf", caf((b"uuid", basic + pairs)))
+        self.run_command("tags", "set", "b.caf", "genre=Jazz")
+        self.run_command("tags", "remove", "b.caf", "beatCount")
+        content = self.run_command("chunks", "get", "b.caf", "uuid").stdout
+        for text, count in ((b"tempo\x00120,5\0", 1), (b"genre\0Jazz\0", 1), (b"beat count", 0)):
+            self.assertEqual(content.count(text), count, text)
+
     def test_edit_options(self):
         for name in SAMPLES:
             content = (self.folder / name).read_bytes()
@@ -241,6 +270,48 @@ class Copy(TagsTest):
         aiff_with(self.folder / "b.aiff", (b"PTCH", b"old!"))
         self.run_command("tags", "copy", "a.aiff", "b.aiff")
         self.assertEqual(self.run_command("chunks", "get", "b.aiff", "PTCH").stdout, b"new!")
+
+
+class Outside(TagsTest):
+    """What sox and ffmpeg see after each kind of edit: the samples and the information of others, unchanged."""
+    OWN = ("title", "artist", "copyright", "comments")
+
+    def setUp(self):
+        super().setUp()
+        entries = {"title": "Old", "artist": "Other", "year": "1999", "encoding application": "Sömething", "genre": "G"}
+        pairs = b"".join(f"{key}\0{text}\0".encode() for key, text in entries.items())
+        info = (b"info", struct.pack(">I", len(entries)) + pairs)
+        self.write("i.caf", caf(info, (b"uuid", bytes(20))))
+        self.write("j.caf", self.behind((self.folder / "i.caf").read_bytes(), info))
+        self.files = [*SAMPLES, "i.caf", "j.caf"]
+        self.before = {name: self.seen(name) for name in self.files}
+        self.assertEqual(self.before["j.caf"][2]["year"], "1999")
+
+    def behind(self, content, chunk):
+        """The CAF file with a chunk behind the samples in the place of the one ahead of them."""
+        header = chunk[0] + struct.pack(">q", len(chunk[1])) + chunk[1]
+        return content.replace(header, b"") + header
+
+    def seen(self, name):
+        def run(*arguments):
+            return subprocess.run(arguments, cwd=self.folder, capture_output=True, check=True).stdout
+        probed = json.loads(run("ffprobe", "-v", "error", "-of", "json", "-show_format", "-show_streams", name))
+        tags = {key.lower(): text for key, text in probed["format"].get("tags", {}).items()}
+        stream = {key: probed["streams"][0].get(key) for key in ("codec_name", "sample_rate", "channels")}
+        return (run("sox", name, "-t", "raw", "-"), run("ffmpeg", "-v", "error", "-i", name, "-f", "md5", "-"),
+                {key: text for key, text in tags.items() if key not in (*self.OWN, "comment", "author")}, stream)
+
+    def test_each_kind_of_edit(self):
+        edits = [["set", "genre=Rock", "beatCount=8", "key=F#", "signature=3/4"], ["set", *Edits.ARGUMENTS],
+                 ["set", "title=" + "long" * 500], ["set", "title=T"], ["set", "transients=1,2,3"],
+                 ["remove", "genre", "artist"], ["remove", "title"], ["copy"], ["remove"]]
+        self.write("from.caf", (self.folder / "i.caf").read_bytes())
+        self.set("from.caf", "genre=Rock", "title=Copied", "transients=7,9")
+        for edit, options in itertools.product(edits, ([], ["--in-place"])):
+            first = ["from.caf"] if edit == ["copy"] else []
+            self.run_command("tags", edit[0], *first, *self.files, *edit[1:], *options)
+            for name in self.files:
+                self.assertEqual(self.seen(name), self.before[name], (edit, options, name))
 
 
 if __name__ == "__main__":

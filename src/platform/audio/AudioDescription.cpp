@@ -13,13 +13,12 @@ namespace {
 using Flag = StreamDescription::Flag;
 
 /// The first bytes of a chunk's body, at most `most`; empty when it has fewer than `least`.
-Bytes bodyOf(const FileBytes& file, const ContainerLayout& layout, const Chunk* chunk, std::size_t least,
-             std::size_t most)
+Bytes bodyOf(const BodyReader& readBody, const Chunk* chunk, std::size_t least, std::size_t most)
 {
     if (chunk == nullptr || chunk->size < least)
         return {};
     Bytes body(static_cast<std::size_t>(std::min<std::uint64_t>(chunk->size, most)));
-    if (file.read(layout.bodyOf(*chunk), body.data(), body.size()) != kStatusOK)
+    if (readBody(*chunk, body.data(), body.size()) != kStatusOK)
         return {};
     return body;
 }
@@ -38,9 +37,9 @@ void setLinearPCM(StreamDescription& format, bool isFloat, bool isBigEndian, boo
     format.bytesPerPacket = format.bytesPerFrame;
 }
 
-std::int32_t describeWAVE(const FileBytes& file, const ContainerLayout& layout, StreamDescription& format)
+std::int32_t describeWAVE(const BodyReader& readBody, const ContainerLayout& layout, StreamDescription& format)
 {
-    const Bytes body = bodyOf(file, layout, layout.find(fourCC("fmt ")), 16, 40);
+    const Bytes body = bodyOf(readBody, layout.find(fourCC("fmt ")), 16, 40);
     if (body.empty())
         return kStatusIOError;
     ByteReader reader(body, std::endian::little);
@@ -99,11 +98,11 @@ void setAIFCFormat(StreamDescription& format, FourCC compression)
     format.framesPerPacket = isCompanded ? 1u : isIMA4 ? 64u : 0u;
 }
 
-std::int32_t describeAIFF(const FileBytes& file, const ContainerLayout& layout, StreamDescription& format,
+std::int32_t describeAIFF(const BodyReader& readBody, const ContainerLayout& layout, StreamDescription& format,
                           std::uint64_t& frames)
 {
     const bool isAIFC = layout.fileType == fourCC("AIFC");
-    const Bytes body = bodyOf(file, layout, layout.find(fourCC("COMM")), isAIFC ? 22 : 18, 22);
+    const Bytes body = bodyOf(readBody, layout.find(fourCC("COMM")), isAIFC ? 22 : 18, 22);
     if (body.empty())
         return kStatusIOError;
     ByteReader reader(body);
@@ -115,9 +114,9 @@ std::int32_t describeAIFF(const FileBytes& file, const ContainerLayout& layout, 
     return kStatusOK;
 }
 
-std::int32_t describeCAF(const FileBytes& file, const ContainerLayout& layout, StreamDescription& format)
+std::int32_t describeCAF(const BodyReader& readBody, const ContainerLayout& layout, StreamDescription& format)
 {
-    const Bytes body = bodyOf(file, layout, layout.find(fourCC("desc")), 32, 32);
+    const Bytes body = bodyOf(readBody, layout.find(fourCC("desc")), 32, 32);
     if (body.empty())
         return kStatusIOError;
     ByteReader reader(body);
@@ -138,14 +137,14 @@ std::int32_t describeCAF(const FileBytes& file, const ContainerLayout& layout, S
 }
 
 /// The packets that a CAF file of packets in differing sizes counts in its packet table.
-std::uint64_t packetsOfTable(const FileBytes& file, const ContainerLayout& layout)
+std::uint64_t packetsOfTable(const BodyReader& readBody, const ContainerLayout& layout)
 {
-    const Bytes body = bodyOf(file, layout, layout.find(fourCC("pakt")), 24, 24);
+    const Bytes body = bodyOf(readBody, layout.find(fourCC("pakt")), 24, 24);
     return body.empty() ? 0 : static_cast<std::uint64_t>(std::max<std::int64_t>(0, loadBE<std::int64_t>(body.data())));
 }
 
 /// Finds the samples in "data" or "SSND".
-std::int32_t locateData(const FileBytes& file, const ContainerLayout& layout, AudioDescription& description)
+std::int32_t locateData(const BodyReader& readBody, const ContainerLayout& layout, AudioDescription& description)
 {
     const Chunk* data = layout.find(layout.audioDataId());
     if (data == nullptr)
@@ -154,7 +153,7 @@ std::int32_t locateData(const FileBytes& file, const ContainerLayout& layout, Au
     if (layout.kind == ContainerKind::caf)
         lead = 4; // edit count
     if (layout.kind == ContainerKind::iff) {
-        const Bytes start = bodyOf(file, layout, data, 8, 8);
+        const Bytes start = bodyOf(readBody, data, 8, 8);
         lead = start.empty() ? 8 : 8 + std::uint64_t{loadBE<std::uint32_t>(start.data())};
     }
     description.dataOffset = layout.bodyOf(*data) + std::min(lead, data->size);
@@ -164,19 +163,19 @@ std::int32_t locateData(const FileBytes& file, const ContainerLayout& layout, Au
 
 } // namespace
 
-std::int32_t describeAudio(const FileBytes& file, const ContainerLayout& layout, AudioDescription& description)
+std::int32_t describeAudio(const BodyReader& readBody, const ContainerLayout& layout, AudioDescription& description)
 {
     description = {};
     StreamDescription& format = description.format;
     std::uint64_t frames = 0; // of AIFF; 0 also when nobody filled it in
-    const std::int32_t status = layout.kind == ContainerKind::riff  ? describeWAVE(file, layout, format)
-                                : layout.kind == ContainerKind::iff ? describeAIFF(file, layout, format, frames)
-                                                                    : describeCAF(file, layout, format);
+    const std::int32_t status = layout.kind == ContainerKind::riff  ? describeWAVE(readBody, layout, format)
+                                : layout.kind == ContainerKind::iff ? describeAIFF(readBody, layout, format, frames)
+                                                                    : describeCAF(readBody, layout, format);
     if (status != kStatusOK)
         return status;
     if (format.channelsPerFrame == 0 || (format.isLinearPCM() && format.bytesPerPacket == 0))
         return kStatusIOError;
-    if (const std::int32_t located = locateData(file, layout, description); located != kStatusOK)
+    if (const std::int32_t located = locateData(readBody, layout, description); located != kStatusOK)
         return located;
     if (format.bytesPerPacket > 0) {
         description.packetCount = description.byteCount / format.bytesPerPacket;
@@ -185,7 +184,7 @@ std::int32_t describeAudio(const FileBytes& file, const ContainerLayout& layout,
             description.byteCount = frames * format.bytesPerPacket;
         }
     } else {
-        description.packetCount = layout.kind == ContainerKind::caf ? packetsOfTable(file, layout) : frames;
+        description.packetCount = layout.kind == ContainerKind::caf ? packetsOfTable(readBody, layout) : frames;
     }
     return kStatusOK;
 }

@@ -5,6 +5,7 @@
 #include "platform/audio/ChunkScanner.h"
 
 #include <cstdint>
+#include <functional>
 
 namespace platform {
 
@@ -15,9 +16,12 @@ struct AudioDescription {
     std::uint64_t packetCount = 0;
 };
 
+/// Reads the first `count` bytes of a chunk's body; 0, or a status.
+using BodyReader = std::function<std::int32_t(const Chunk& chunk, void* to, std::size_t count)>;
+
 /// Reads "fmt ", "COMM" or "desc" and finds the samples. kStatusIOError when a file has none of these, or when their
 /// fields contradict each other.
-std::int32_t describeAudio(const FileBytes& file, const ContainerLayout& layout, AudioDescription& description);
+std::int32_t describeAudio(const BodyReader& readBody, const ContainerLayout& layout, AudioDescription& description);
 
 /// Offset, in the body of "COMM", of the 32-bit frame count.
 inline constexpr std::uint64_t kCommonFramesOffset = 2;

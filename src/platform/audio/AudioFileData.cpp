@@ -16,7 +16,8 @@ std::int32_t AudioFile::Implementation::describe()
     if (status != kStatusOK || description)
         return status;
     AudioDescription found;
-    status = describeAudio(bytes, layout, found);
+    const auto read = [this](const Chunk& chunk, void* to, std::size_t count) { return readBody(chunk, to, count); };
+    status = describeAudio(read, layout, found);
     if (status == kStatusOK)
         description = found;
     return status;

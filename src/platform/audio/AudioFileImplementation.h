@@ -12,18 +12,20 @@
 
 namespace platform {
 
-/// Owns the descriptor. Keeps what it read of the container until an edit, or a change of the file's length, makes it
-/// read again.
+/// Owns the descriptor. Of a file that is open for writing it keeps what it read of the container until an edit, or a
+/// change of the file's length, makes it read again; of one that is only read, as long as it is open.
 struct AudioFile::Implementation {
     Implementation(int descriptor, Permission access) : bytes(descriptor), isWritable(access == Permission::readWrite)
     {
     }
 
     std::int32_t scan();
+    std::int32_t scan(std::uint64_t fileLength);
     /// Scans again when the file is not what was scanned.
     std::int32_t refresh();
     /// Places, in the layout's list, of the chunks of a type; enumerating them by index stays linear.
     const std::vector<std::uint32_t>& itemsOf(FourCC type);
+    std::int32_t readBody(const Chunk& chunk, void* to, std::size_t count) const;
     std::int32_t findItem(FourCC type, std::uint32_t index, const Chunk*& chunk);
     std::int32_t checkEdit(FourCC type) const;
     std::int32_t setItem(FourCC type, std::uint32_t index, BytesView body);
@@ -37,6 +39,7 @@ struct AudioFile::Implementation {
     bool isWritable;
     bool isStale = true;
     ContainerLayout layout;
+    std::optional<HeaderWindow> window; // of the last scan
     std::optional<AudioDescription> description;
     std::optional<FourCC> itemsType;
     std::vector<std::uint32_t> items;

@@ -77,11 +77,18 @@ std::int32_t AudioFile::setInformation(const Dictionary& information)
     }
     if (writer.size() > std::numeric_limits<std::uint32_t>::max())
         return kStatusFileTooBig;
+    // A further "info", which nobody reads, would become the first when that one must move, or goes.
+    std::uint32_t count = 0, size = 0;
+    if (const std::int32_t status = countUserData(kInfo, count); status != kStatusOK)
+        return status;
+    const bool isInPlace =
+        !information.empty() && count > 0 && userDataSize(kInfo, 0, size) == kStatusOK && size == writer.size();
+    for (; count > 1 && !isInPlace; --count)
+        if (const std::int32_t status = implementation_->removeItem(kInfo, count - 1); status != kStatusOK)
+            return status;
     if (!information.empty())
         return implementation_->setItem(kInfo, 0, writer.view());
-    std::uint32_t count = 0;
-    const std::int32_t status = countUserData(kInfo, count);
-    return status != kStatusOK || count == 0 ? status : implementation_->removeItem(kInfo, 0);
+    return count == 0 ? kStatusOK : implementation_->removeItem(kInfo, 0);
 }
 
 } // namespace platform

@@ -86,13 +86,17 @@ std::unique_ptr<AudioFile> AudioFile::open(const URL& url, Permission permission
     }
     FileStatus found;
     const OpenFor access = permission == Permission::read ? OpenFor::reading : OpenFor::readingAndWriting;
-    const int descriptor = systemCalls().openFile(path.c_str(), access, &found);
+    // Few paths lead through links; one that does not is opened for reading with a call less.
+    int descriptor =
+        permission == Permission::read ? systemCalls().openFileWithoutLinks(path.c_str(), access, &found) : -1;
+    if (descriptor < 0)
+        descriptor = systemCalls().openFile(path.c_str(), access, &found);
     if (descriptor < 0) {
         result = failure();
         return nullptr;
     }
     auto implementation = std::make_unique<Implementation>(descriptor, permission);
-    result = implementation->scan();
+    result = implementation->scan(static_cast<std::uint64_t>(std::max<std::int64_t>(found.size, 0)));
     if (result != kStatusOK)
         return nullptr;
     return std::unique_ptr<AudioFile>(new AudioFile(std::move(implementation)));
@@ -130,20 +134,29 @@ FourCC AudioFile::fileType() const
 
 std::int32_t AudioFile::Implementation::scan()
 {
+    std::uint64_t length = 0;
+    const std::int32_t status = bytes.length(length);
+    isStale = true;
+    return status == kStatusOK ? scan(length) : status;
+}
+
+std::int32_t AudioFile::Implementation::scan(std::uint64_t fileLength)
+{
     description.reset();
     itemsType.reset();
-    isStale = true;
-    const std::int32_t status = scanChunks(bytes, layout);
+    const std::int32_t status = scanChunks(window.emplace(bytes, fileLength), layout);
     isStale = status != kStatusOK;
     return status;
 }
 
 std::int32_t AudioFile::Implementation::refresh()
 {
+    if (!isWritable && !isStale)
+        return kStatusOK;
     std::uint64_t length = 0;
     if (const std::int32_t status = bytes.length(length); status != kStatusOK)
         return status;
-    return isStale || length != layout.fileLength ? scan() : kStatusOK;
+    return isStale || length != layout.fileLength ? scan(length) : kStatusOK;
 }
 
 // User data.
@@ -159,6 +172,17 @@ const std::vector<std::uint32_t>& AudioFile::Implementation::itemsOf(FourCC type
         itemsType = type;
     }
     return items;
+}
+
+/// What the scan read on its way need not be read again.
+std::int32_t AudioFile::Implementation::readBody(const Chunk& chunk, void* to, std::size_t count) const
+{
+    const std::uint64_t position = layout.bodyOf(chunk);
+    const std::byte* held = isWritable ? nullptr : window->held(position, count);
+    if (held == nullptr)
+        return bytes.read(position, to, count);
+    std::copy_n(held, count, static_cast<std::byte*>(to));
+    return kStatusOK;
 }
 
 std::int32_t AudioFile::Implementation::findItem(FourCC type, std::uint32_t index, const Chunk*& chunk)
@@ -213,8 +237,9 @@ std::int32_t AudioFile::Implementation::removeItem(FourCC type, std::uint32_t in
 std::int32_t AudioFile::countUserData(FourCC type, std::uint32_t& count)
 {
     count = 0;
-    // Always from the file: others may have changed it, and whoever enumerates begins here.
-    if (const std::int32_t status = implementation_->scan(); status != kStatusOK)
+    // What may be edited is read anew: others may have changed it, and whoever enumerates begins here.
+    const std::int32_t status = implementation_->isWritable ? implementation_->scan() : implementation_->refresh();
+    if (status != kStatusOK)
         return status;
     count = static_cast<std::uint32_t>(implementation_->itemsOf(type).size());
     return kStatusOK;
@@ -241,7 +266,7 @@ std::int32_t AudioFile::userData(FourCC type, std::uint32_t index, std::uint32_t
     if (const std::int32_t status = implementation_->findItem(type, index, chunk); status != kStatusOK)
         return status;
     const auto count = static_cast<std::uint32_t>(std::min<std::uint64_t>(capacity, chunk->size));
-    const std::int32_t status = implementation_->bytes.read(implementation_->layout.bodyOf(*chunk), data, count);
+    const std::int32_t status = implementation_->readBody(*chunk, data, count);
     if (status == kStatusOK)
         size = count;
     return status;

@@ -12,35 +12,6 @@ namespace {
 constexpr std::size_t kMaximumChunks = std::size_t{1} << 22;
 constexpr std::uint32_t kSizeIs64Bit = 0xFFFFFFFF;
 
-/// Small reads at ascending positions, out of one window: a file of tiny chunks costs few calls.
-class HeaderReader {
-public:
-    explicit HeaderReader(const FileBytes& file) : file_(file) {}
-
-    /// `count` bytes at `position`, or null at the end of the file and on an error, which `status` keeps.
-    const std::byte* at(std::uint64_t position, std::size_t count)
-    {
-        if (position < start_ || position - start_ > held_ || held_ - (position - start_) < count) {
-            start_ = position;
-            held_ = 0;
-            if (const std::int32_t result = file_.readSome(position, window_.data(), window_.size(), held_);
-                result != kStatusOK)
-                status = result;
-            if (held_ < count)
-                return nullptr;
-        }
-        return window_.data() + (position - start_);
-    }
-
-    std::int32_t status = kStatusOK;
-
-private:
-    const FileBytes& file_;
-    std::uint64_t start_ = 0;
-    std::size_t held_ = 0;
-    std::array<std::byte, 4096> window_;
-};
-
 /// What the "ds64" chunk says, if there is one that counts.
 struct Sizes64 {
     std::uint64_t riffSize = 0;
@@ -55,26 +26,26 @@ struct Sizes64 {
 
 class Scan {
 public:
-    Scan(const FileBytes& file, ContainerLayout& layout) : reader_(file), layout_(layout) {}
+    Scan(HeaderWindow& reader, ContainerLayout& layout) : reader_(reader), layout_(layout) {}
 
     std::int32_t run()
     {
         const std::byte* start = reader_.at(0, 8);
         if (start == nullptr)
-            return reader_.status != kStatusOK ? reader_.status : kStatusParameterError;
+            return reader_.status() != kStatusOK ? reader_.status() : kStatusParameterError;
         const FourCC id = loadBE<FourCC>(start);
         if (id == fourCC("caff")) {
             layout_.kind = ContainerKind::caf;
             layout_.fileType = id;
             walkCAF();
         } else if (!recognize(id)) {
-            return reader_.status != kStatusOK ? reader_.status : kStatusParameterError;
+            return reader_.status() != kStatusOK ? reader_.status() : kStatusParameterError;
         } else {
             walk();
         }
         if (layout_.chunks.size() >= kMaximumChunks)
             return kStatusOutOfMemory;
-        return reader_.status;
+        return reader_.status();
     }
 
 private:
@@ -183,17 +154,18 @@ private:
     /// Records the chunk at the end; false when there is none, and no more can follow.
     bool append(FourCC id, std::uint64_t size)
     {
-        if ((id == 0 && size == 0) || layout_.chunks.size() >= kMaximumChunks) {
+        const std::uint64_t available = layout_.fileLength - layout_.end - layout_.headerSize();
+        // Zeros are no chunk, nor is what would be zeros with a size that is put right.
+        if ((id == 0 && std::min(size, available) == 0) || layout_.chunks.size() >= kMaximumChunks) {
             layout_.isBroken = true;
             return false;
         }
-        const std::uint64_t available = layout_.fileLength - layout_.end - layout_.headerSize();
         layout_.chunks.push_back(
             {.position = layout_.end, .size = std::min(size, available), .id = id, .sizeIsStale = size > available});
         return true;
     }
 
-    HeaderReader reader_;
+    HeaderWindow& reader_;
     ContainerLayout& layout_;
     Sizes64 sizes64_;
 };
@@ -217,12 +189,20 @@ const Chunk* ContainerLayout::find(FourCC id) const
     return found == chunks.end() ? nullptr : &*found;
 }
 
-std::int32_t scanChunks(const FileBytes& file, ContainerLayout& layout)
+std::int32_t scanChunks(HeaderWindow& window, ContainerLayout& layout)
 {
     layout = {};
-    if (const std::int32_t status = file.length(layout.fileLength); status != kStatusOK)
+    layout.fileLength = window.length();
+    return Scan(window, layout).run();
+}
+
+std::int32_t scanChunks(const FileBytes& file, ContainerLayout& layout)
+{
+    std::uint64_t length = 0;
+    if (const std::int32_t status = file.length(length); status != kStatusOK)
         return status;
-    return Scan(file, layout).run();
+    HeaderWindow window(file, length);
+    return scanChunks(window, layout);
 }
 
 } // namespace platform

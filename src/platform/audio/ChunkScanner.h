@@ -2,7 +2,7 @@
 // Published sources: EA IFF 85, AIFF 1.3 and AIFC, EBU Tech 3306 (RF64), ITU-R BS.2088 (BW64), the CAF specification.
 #pragma once
 
-#include "platform/audio/FileBytes.h"
+#include "platform/audio/HeaderWindow.h"
 #include "platform/core/FourCC.h"
 
 #include <array>
@@ -64,6 +64,8 @@ struct ContainerLayout {
 
 /// Reads the layout of the whole file; in one pass, in time and memory in proportion to the number of chunks.
 /// kStatusParameterError for a file of another kind, kStatusOutOfMemory beyond 4,194,304 chunks.
+std::int32_t scanChunks(HeaderWindow& window, ContainerLayout& layout);
+/// The same through a window of its own.
 std::int32_t scanChunks(const FileBytes& file, ContainerLayout& layout);
 
 } // namespace platform

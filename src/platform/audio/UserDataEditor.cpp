@@ -86,6 +86,19 @@ UserDataEditor::Piece UserDataEditor::pieceOf(std::size_t chunk) const
     return {asked.id, asked.size, {}, layout_.bodyOf(asked)};
 }
 
+/// Whether one filler between two places would end where it should: readers take a zero behind an odd size for the pad
+/// byte. Sizes are odd where chunks lack theirs, and only there can an id that begins with zero follow.
+bool UserDataEditor::canBeFiller(std::uint64_t position, std::uint64_t end, std::optional<FourCC> nextId) const
+{
+    if (layout_.padOf(end - position) == 0)
+        return true;
+    const auto next = std::find_if(layout_.chunks.begin(), layout_.chunks.end(),
+                                   [end](const Chunk& chunk) { return chunk.position == end; });
+    if (!nextId && next != layout_.chunks.end())
+        nextId = next->id;
+    return !nextId || *nextId >> 24 != 0;
+}
+
 std::uint64_t UserDataEditor::extentOf(const Content& content) const
 {
     return std::accumulate(
@@ -198,6 +211,11 @@ std::optional<std::int32_t> UserDataEditor::fillFront(const Run& filler, std::ui
     const std::uint64_t restSize = exact ? 0 : hiddenEnd - filler.position - extent - layout_.headerSize();
     if (restSize > layout_.largestChunk() || room > layout_.largestChunk())
         return std::nullopt;
+    // Nor may the pad byte that the chunk ahead lacks appear.
+    if (filler.first > 0 && layout_.chunks[filler.first - 1].padMissing && content.front().id >> 24 == 0)
+        return std::nullopt;
+    if (!canBeFiller(filler.position, filler.end) || (!exact && !canBeFiller(filler.position + extent, hiddenEnd)))
+        return std::nullopt;
     if (const std::int32_t status = mergeFiller(filler); status != kStatusOK)
         return status;
 
@@ -226,6 +244,9 @@ std::optional<std::int32_t> UserDataEditor::fillBehind(std::uint64_t hiddenFrom,
     if (end != filler.end && end + layout_.headerSize() > filler.end)
         return std::nullopt;
     if (filler.end - hiddenFrom > layout_.largestChunk())
+        return std::nullopt;
+    if (!canBeFiller(filler.position, filler.end) || !canBeFiller(hiddenFrom, start, content.front().id) ||
+        (end != filler.end && !canBeFiller(end, filler.end)))
         return std::nullopt;
     if (const std::int32_t status = mergeFiller(filler); status != kStatusOK)
         return status;
@@ -308,7 +329,7 @@ std::int32_t UserDataEditor::appendPiece(const Piece& piece)
 std::int32_t UserDataEditor::hide(std::size_t chunk)
 {
     Run hidden = runAround(chunk);
-    if (hidden.end - hidden.position > layout_.largestChunk())
+    if (hidden.end - hidden.position > layout_.largestChunk() || !canBeFiller(hidden.position, hidden.end))
         hidden = run(chunk, chunk + 1);
     const std::uint64_t size = hidden.end - hidden.position - layout_.headerSize();
     return size <= layout_.largestChunk() ? writeHeader(hidden.position, ContainerLayout::filler, size)

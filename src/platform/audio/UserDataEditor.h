@@ -49,6 +49,7 @@ private:
     Run runAround(std::size_t chunk) const;
     Run run(std::size_t first, std::size_t past) const;
     Piece pieceOf(std::size_t chunk) const;
+    bool canBeFiller(std::uint64_t position, std::uint64_t end, std::optional<FourCC> nextId = {}) const;
     std::uint64_t extentOf(const Content& content) const;
     std::optional<Content> everythingFrom(std::size_t chunk) const;
 

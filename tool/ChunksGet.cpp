@@ -5,16 +5,12 @@
 #include "EditGuards.h"
 #include "Failure.h"
 #include "InputFile.h"
+#include "OutputFile.h"
 #include "Progress.h"
-#include "TemporaryFile.h"
 
 #include <nlohmann/json.hpp>
 
 #include <algorithm>
-#include <cerrno>
-#include <fcntl.h>
-#include <filesystem>
-#include <sys/stat.h>
 #include <unistd.h>
 
 namespace {
@@ -27,16 +23,6 @@ struct GetArguments {
     std::string out;
 };
 
-void writeWhole(int descriptor, std::string_view bytes)
-{
-    while (!bytes.empty()) {
-        const ssize_t written = ::write(descriptor, bytes.data(), bytes.size());
-        if (written < 0 && errno != EINTR)
-            throw Failure("the output cannot be written: " + systemErrorText(errno));
-        bytes.remove_prefix(static_cast<std::size_t>(std::max<ssize_t>(written, 0)));
-    }
-}
-
 // A body that would do mischief on a terminal; text, as in "iXML" and "axml", is welcome there.
 bool isBinary(std::string_view bytes)
 {
@@ -45,8 +31,6 @@ bool isBinary(std::string_view bytes)
         return (byte < 0x20 && c != '\n' && c != '\r' && c != '\t') || byte == 0x7F;
     });
 }
-
-using Sink = std::function<void(std::string_view)>;
 
 void copyBody(CAudioFileIO& file, std::int64_t offset, std::int64_t size, bool quiet, const Sink& sink)
 {
@@ -74,33 +58,6 @@ void getToOutput(CAudioFileIO& file, std::int64_t offset, std::int64_t size, boo
     });
 }
 
-// A regular file takes its name when it is whole; a device or a FIFO is written as it is.
-void getToFile(CAudioFileIO& file, std::int64_t offset, std::int64_t size, bool quiet, const GetArguments& arguments)
-{
-    struct stat source = {}, existing = {};
-    const bool exists = ::stat(arguments.out.c_str(), &existing) == 0;
-    if (exists && S_ISDIR(existing.st_mode))
-        throw Failure(arguments.out + " is a folder");
-    if (exists && ::stat(arguments.file.c_str(), &source) == 0 && source.st_dev == existing.st_dev &&
-        source.st_ino == existing.st_ino)
-        throw Failure("the chunk would be written over the file itself");
-    if (exists && !S_ISREG(existing.st_mode)) {
-        const Descriptor out(::open(arguments.out.c_str(), O_WRONLY | O_NOCTTY | O_CLOEXEC));
-        copyBody(file, offset, size, quiet, [&](std::string_view bytes) { writeWhole(out.get(), bytes); });
-        return;
-    }
-    const std::string target = exists ? std::filesystem::canonical(arguments.out).string() : arguments.out;
-    if (exists && ::access(target.c_str(), W_OK) != 0)
-        throw Failure(arguments.out + ": " + systemErrorText(errno));
-    TemporaryFile out(target);
-    copyBody(file, offset, size, quiet, [&](std::string_view bytes) { writeWhole(out.descriptor(), bytes); });
-    const mode_t mask = ::umask(0);
-    ::umask(mask);
-    if (::fchmod(out.descriptor(), exists ? existing.st_mode & 0777 : 0666 & ~mask) != 0)
-        throw Failure(systemErrorText(errno));
-    out.replace(target);
-}
-
 void getChunk(const GetArguments& arguments, const OutputOptions& options)
 {
     CAudioFileIO file;
@@ -117,7 +74,8 @@ void getChunk(const GetArguments& arguments, const OutputOptions& options)
     if (arguments.out.empty() || arguments.out == "-")
         getToOutput(file, offset, size, options.quiet, arguments.out == "-");
     else
-        getToFile(file, offset, size, options.quiet, arguments);
+        writeOutputFile(arguments.out, arguments.file,
+                        [&](const Sink& sink) { copyBody(file, offset, size, options.quiet, sink); });
     if (options.json)
         Output::standard().print(
             "{}\n", jsonText({{"path", arguments.file}, {"id", id}, {"offset", survey.found->offset}, {"size", size}}));

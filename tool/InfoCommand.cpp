@@ -1,12 +1,11 @@
 // ktfiles info: what audio files are.
+#include "ClockTime.h"
 #include "CommandLine.h"
 #include "Failure.h"
 #include "InputFile.h"
 #include "Table.h"
 
 #include <nlohmann/json.hpp>
-
-#include <cmath>
 
 namespace {
 
@@ -29,17 +28,6 @@ AudioFileInfo describe(const std::string& path)
 double durationOf(const AudioFileInfo& info)
 {
     return info.exactSampleRate > 0 ? static_cast<double>(info.frames) / info.exactSampleRate : 0;
-}
-
-// Minutes and seconds, with hours where there are any: "1:02:03.456".
-std::string durationText(double seconds)
-{
-    const auto milliseconds = static_cast<std::int64_t>(std::llround(std::min(seconds, 1e15) * 1000));
-    const std::int64_t minutes = milliseconds / 60'000;
-    const std::int64_t rest = milliseconds % 60'000;
-    const std::string clock =
-        minutes < 60 ? fmt::format("{}", minutes) : fmt::format("{}:{:02}", minutes / 60, minutes % 60);
-    return fmt::format("{}:{:02}.{:03}", clock, rest / 1000, rest % 1000);
 }
 
 std::string rateText(const AudioFileInfo& info)

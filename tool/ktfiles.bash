@@ -12,14 +12,16 @@ _ktfiles()
 
     case $prev in
         --color) COMPREPLY=($(compgen -W 'auto always never' -- "$cur")); return ;;
-        --from | -o | --output) _filedir; return ;;
+        --from | -o | --output | --png | --svg) _filedir; return ;;
+        --colors) COMPREPLY=($(compgen -W 'night day amber rose ink' -- "$cur")); return ;;
+        --width | --height | --start | --end) return ;;
     esac
 
     if ((cword == 1)); then
-        COMPREPLY=($(compgen -W 'info chunks tags scan help --help --version' -- "$cur"))
+        COMPREPLY=($(compgen -W 'info chunks tags scan overview help --help --version' -- "$cur"))
     elif [[ $verb == help ]]; then
         if ((cword == 2)); then
-            COMPREPLY=($(compgen -W 'info chunks tags scan' -- "$cur"))
+            COMPREPLY=($(compgen -W 'info chunks tags scan overview' -- "$cur"))
         elif ((cword == 3)) && [[ $object == chunks ]]; then
             COMPREPLY=($(compgen -W 'get add remove' -- "$cur"))
         elif ((cword == 3)) && [[ $object == tags ]]; then
@@ -31,6 +33,8 @@ _ktfiles()
             chunks/add) COMPREPLY=($(compgen -W "--from --replace --force $edit $common" -- "$cur")) ;;
             chunks/remove) COMPREPLY=($(compgen -W "--force $edit $common" -- "$cur")) ;;
             tags/set | tags/remove | tags/copy) COMPREPLY=($(compgen -W "$edit $common" -- "$cur")) ;;
+            overview/*) COMPREPLY=($(compgen -W "--png --svg --width --height --start --end --scale --colors --stored
+                --store $edit $common" -- "$cur")) ;;
             scan/*) COMPREPLY=($(compgen -W "--csv --threads $common" -- "$cur")) ;;
             *) COMPREPLY=($(compgen -W "$common" -- "$cur")) ;;
         esac

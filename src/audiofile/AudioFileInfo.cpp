@@ -78,6 +78,8 @@ void SetSampleData(AudioFileInfo& info, std::int64_t offset, std::uint64_t size)
     info.dataOffset = offset;
     const std::int64_t there = std::max<std::int64_t>(info.fileLength - offset, 0);
     info.dataSize = static_cast<std::int64_t>(std::min<std::uint64_t>(size, static_cast<std::uint64_t>(there)));
+    constexpr std::uint64_t toTheEnd = INT64_MAX; // of a recording that does not say how long it is
+    info.missingDataSize = size < toTheEnd ? static_cast<std::int64_t>(size) - info.dataSize : 0;
 }
 
 void SetLoopTiming(AudioFileInfo& info, const std::optional<tagging::LoopTiming>& timing)

@@ -54,6 +54,7 @@ struct KT_EXPORT AudioFileInfo {
     bool compressed = false;             // described, not decodable as PCM
     std::int32_t bytesPerFrame = 0;      // of linear PCM; samples left-aligned in their containers
     std::int64_t dataSize = 0;           // sample bytes that are in the file
+    std::int64_t missingDataSize = 0;    // sample bytes that the header promises and the file ends ahead of
     TAudioBusFormat busFormat = kAudioBusUndefined;
 
     bool IsLinearPCM() const { return !compressed && bytesPerFrame > 0 && sampleFormat.isSupported(); }

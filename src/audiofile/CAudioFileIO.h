@@ -98,6 +98,16 @@ public:
     /// kStatusParameterError when bytes that are no samples lie behind the sample data and would be written over.
     std::int32_t WriteFrames(const float* from, long long frame, long count);
 
+    /// Told now and then how many frames of the file are done; false ends the work.
+    using OverviewProgress = std::function<bool(long long framesDone, long long frames)>;
+    /// A waveform overview of the whole file (loops/overview/OverviewBlock.h says how its bytes are laid out), or none:
+    /// `status` (may be null) then says why. kStatusEndOfFile for a file without frames, kStatusParameterError for data
+    /// that is not linear PCM or has more than 2,048 channels, kStatusUserCancelled when `progress` (may be empty)
+    /// returned false, else the status of the read that failed. Of a file that ends ahead of its sample data, what is
+    /// there; AudioFileInfo::missingDataSize tells. Defined in loops/overview/.
+    std::unique_ptr<KTMem> CreateOverview();
+    std::unique_ptr<KTMem> CreateOverview(const OverviewProgress& progress, std::int32_t* status = nullptr);
+
     /// Reverses the bytes of a value unless the open file is "WAVE".
     void ByteOrder(int* value) const;
     void ByteOrder(unsigned int* value) const;

@@ -15,6 +15,7 @@ ARROWS = {
     "loops/tagging": {"platform/core"},
     "audiofile": {"files", "loops/tagging", "platform"},
     "loops": {"audiofile", "files", "loops/tagging", "platform"},
+    "loops/overview": {"audiofile", "files", "platform"},
     "adm": {"platform"},
     "project": {"files", "platform"},
     "coordination": {"platform"},

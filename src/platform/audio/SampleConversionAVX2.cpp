@@ -2,42 +2,17 @@
 
 #if defined(__x86_64__)
 
-#include <immintrin.h>
-
-// Only these functions are compiled for AVX2; the library runs everywhere.
-#define KT_AVX2 __attribute__((target("avx2")))
+#include "platform/audio/SampleLanesAVX2.h"
 
 namespace platform {
 namespace {
 
-using Byte = unsigned char;
+using namespace avx2;
 constexpr std::size_t kStep = 8; // samples in a vector of floats
-
-KT_AVX2 inline __m128i load16(const Byte* from)
-{
-    return _mm_loadu_si128(reinterpret_cast<const __m128i*>(from));
-}
 
 KT_AVX2 inline void store16(Byte* to, __m128i value)
 {
     _mm_storeu_si128(reinterpret_cast<__m128i*>(to), value);
-}
-
-KT_AVX2 inline __m128i swap2(__m128i value)
-{
-    return _mm_shuffle_epi8(value, _mm_setr_epi8(1, 0, 3, 2, 5, 4, 7, 6, 9, 8, 11, 10, 13, 12, 15, 14));
-}
-
-KT_AVX2 inline __m256i swap4(__m256i value)
-{
-    return _mm256_shuffle_epi8(
-        value, _mm256_broadcastsi128_si256(_mm_setr_epi8(3, 2, 1, 0, 7, 6, 5, 4, 11, 10, 9, 8, 15, 14, 13, 12)));
-}
-
-KT_AVX2 inline __m256i swap8(__m256i value)
-{
-    return _mm256_shuffle_epi8(
-        value, _mm256_broadcastsi128_si256(_mm_setr_epi8(7, 6, 5, 4, 3, 2, 1, 0, 15, 14, 13, 12, 11, 10, 9, 8)));
 }
 
 // Eight samples, left-aligned or not: `kScale` brings them to [-1, 1).
@@ -57,13 +32,7 @@ struct Integers {
             const __m128i words = load16(from);
             return _mm256_cvtepi16_epi32(Big ? swap2(words) : words);
         } else if constexpr (Bytes == 3) {
-            // Two overlapping loads take the 24 bytes and none beyond.
-            const __m256i bytes = _mm256_setr_m128i(load16(from), load16(from + 8));
-            const __m256i little = _mm256_setr_epi8(-1, 0, 1, 2, -1, 3, 4, 5, -1, 6, 7, 8, -1, 9, 10, 11, //
-                                                    -1, 4, 5, 6, -1, 7, 8, 9, -1, 10, 11, 12, -1, 13, 14, 15);
-            const __m256i big = _mm256_setr_epi8(-1, 2, 1, 0, -1, 5, 4, 3, -1, 8, 7, 6, -1, 11, 10, 9, //
-                                                 -1, 6, 5, 4, -1, 9, 8, 7, -1, 12, 11, 10, -1, 15, 14, 13);
-            return _mm256_shuffle_epi8(bytes, Big ? big : little);
+            return load24<Big>(from);
         } else {
             const __m256i words = _mm256_loadu_si256(reinterpret_cast<const __m256i*>(from));
             return Big ? swap4(words) : words;

@@ -1,0 +1,266 @@
+#include "loops/overview/StoredOverview.h"
+
+#include "audiofile/CAudioFileIO.h"
+#include "loops/overview/CAFOverview.h"
+#include "platform/core/Packed.h"
+
+#include <algorithm>
+#include <array>
+#include <cstring>
+#include <utility>
+
+namespace {
+
+constexpr FourCC kOverview = fourCC("LGWV");
+constexpr FourCC kOlderOverview = fourCC("ovwf");
+constexpr FourCC kCAFOverview = fourCC("ovvw");
+
+constexpr std::int32_t kFound = 1;
+constexpr std::int32_t kNotFound = 0;
+constexpr std::int32_t kOutOfMemory = -108;
+
+constexpr std::int64_t kOlderPrefixSize = 20;
+constexpr std::int64_t kChunkHeaderSize = sizeof(ChkHeader);
+
+struct Body {
+    std::int64_t offset = 0;
+    std::int64_t size = 0;
+};
+
+/// 1 found, 0 not found, or an error; one for a body that is not all in the file, too.
+std::int32_t findBody(CAudioFileIO& file, FourCC id, Body& body)
+{
+    const std::int64_t headerSize =
+        file.Info().fileType == kCaff ? std::int64_t{sizeof(CAFChunkHeader)} : kChunkHeaderSize;
+    long size = 0;
+    long long position = 0;
+    long long next = 0;
+    const std::int32_t result = file.FindChunk(id, nullptr, &size, &position, &next);
+    body = {position + headerSize, size};
+    if (result == kFound && (size < 0 || size > file.GetEOF() - body.offset))
+        return kStatusEndOfFile;
+    return result;
+}
+
+/// The words of the header from the container's order to the host's, or back.
+void swapHeader(KTMem& block)
+{
+    OverviewHeader header;
+    std::memcpy(&header, block.data(), sizeof header);
+    header = {byteSwapped(header.frames), byteSwapped(header.reserved)};
+    std::memcpy(block.data(), &header, sizeof header);
+}
+
+bool isHostOrder(const AudioFileInfo& info)
+{
+    return (info.fileType == kAIFF ? std::endian::big : std::endian::little) == std::endian::native;
+}
+
+bool isAccepted(const AudioFileInfo& info)
+{
+    return info.fileType == kAIFF || info.fileType == kWAVE || info.fileType == kCaff;
+}
+
+// ---- writing
+
+bool isSilence(const KTMem& overview)
+{
+    const OverviewPoint* points = OverviewPointsOf(overview);
+    return std::all_of(points, points + OverviewPoints(overview),
+                       [](OverviewPoint point) { return point.minimum == 0 && point.maximum == 0; });
+}
+
+/// Removing takes out the first only, and the first is the one that is found. One that goes beyond the end of the file
+/// would hide what is put behind it.
+std::int32_t removeCAFOverviews(CAudioFileIO& file)
+{
+    for (;;) {
+        Body body;
+        const std::int32_t found = findBody(file, kCAFOverview, body);
+        if (found != kFound)
+            return found;
+        if (const std::int32_t status = file.RemoveChunk(kCAFOverview); status != kStatusOK)
+            return status;
+    }
+}
+
+std::int32_t writeCAF(CAudioFileIO& file, const KTMem& overview, bool& stored)
+{
+    Body data;
+    Packed<std::uint32_t> editCount;
+    // One that is open-ended, of size -1, is not found, and one that goes beyond the end of the file is an error: what
+    // is put behind them would be samples.
+    if (findBody(file, kData, data) != kFound || data.size < std::int64_t{sizeof editCount})
+        return kStatusParameterError;
+    if (const std::int32_t status = file.Read(&editCount, data.offset, sizeof editCount, nullptr); status != kStatusOK)
+        return status;
+    KTMem chunk;
+    const bool isSilent = isSilence(overview);
+    if (!isSilent && !makeCAFOverview(overview, editCount, chunk))
+        return kOutOfMemory;
+    if (const std::int32_t status = removeCAFOverviews(file); status != kStatusOK)
+        return status;
+    if (isSilent)
+        return kStatusOK;
+    const std::int32_t added = file.AddChunk(kCAFOverview, BytesView(chunk.data(), chunk.size()), false);
+    stored = added == kFound;
+    return stored ? kStatusOK : added;
+}
+
+std::int32_t writeChunked(CAudioFileIO& file, KTMem& overview, bool& stored)
+{
+    const bool swaps = !isHostOrder(file.Info());
+    if (swaps)
+        swapHeader(overview);
+    const std::int32_t added = file.AddChunk(kOverview, BytesView(overview.data(), overview.size()), true);
+    if (swaps)
+        swapHeader(overview);
+    stored = added == kFound;
+    if (added == kNotFound) // no chunked container after all
+        return kStatusParameterError;
+    return stored ? kStatusOK : added;
+}
+
+// ---- reading
+
+/// A file of compressed samples may claim any number of frames: what would not fit into the file many times over is not
+/// allocated.
+bool isPlausible(const CAudioFileIO& file, std::int64_t frames)
+{
+    constexpr std::int64_t always = 1 << 20;
+    return frames > 0 && OverviewPointCount(frames) <= std::max<std::int64_t>(file.GetEOF(), always);
+}
+
+std::int32_t readPairs(CAudioFileIO& file, Body pairs, CAFOverviewFolder& folder)
+{
+    std::array<CAFOverviewPair, 2048> piece;
+    std::int64_t left = pairs.size / std::int64_t{sizeof(CAFOverviewPair)};
+    for (std::int64_t offset = pairs.offset; left > 0 && !folder.isDone();) {
+        const auto count = std::min<std::int64_t>(left, piece.size());
+        const auto size = static_cast<long>(count * std::int64_t{sizeof(CAFOverviewPair)});
+        if (const std::int32_t status = file.Read(piece.data(), offset, size, nullptr); status != kStatusOK)
+            return status;
+        for (auto pair = piece.begin(); pair != piece.begin() + count && !folder.isDone(); ++pair)
+            folder.add(*pair);
+        left -= count;
+        offset += size;
+    }
+    folder.finish();
+    return kStatusOK;
+}
+
+std::int32_t readCAF(CAudioFileIO& file, std::int64_t frames, KTMem& block)
+{
+    Body body;
+    const std::int32_t found = findBody(file, kCAFOverview, body);
+    if (found != kFound)
+        return found;
+    CAFOverviewHeader header;
+    if (body.size < std::int64_t{sizeof header} || !isPlausible(file, frames))
+        return kStatusParameterError;
+    if (const std::int32_t status = file.Read(&header, body.offset, sizeof header, nullptr); status != kStatusOK)
+        return status;
+    const auto framesPerPair =
+        static_cast<std::int32_t>(inByteOrder(std::uint32_t{header.framesPerSample}, std::endian::big));
+    if (framesPerPair < 1) // 2^31 and more are no number of frames either
+        return kStatusParameterError;
+    if (!block.allocate(OverviewBlockSize(frames)))
+        return kStatusOutOfMemory;
+    SetOverviewFrames(block, frames);
+    CAFOverviewFolder folder(block, frames, framesPerPair);
+    const std::int64_t headerSize = sizeof header;
+    const std::int32_t status = readPairs(file, {body.offset + headerSize, body.size - headerSize}, folder);
+    return status == kStatusOK ? kFound : status;
+}
+
+std::int32_t readPlain(CAudioFileIO& file, std::int64_t frames, KTMem& block)
+{
+    Body body;
+    const std::int32_t found = findBody(file, kOverview, body);
+    if (found != kFound)
+        return found;
+    if (body.size != static_cast<std::int64_t>(OverviewBlockSize(frames)))
+        return kStatusParameterError;
+    if (!block.allocate(static_cast<std::size_t>(body.size)))
+        return kStatusOutOfMemory;
+    const std::int32_t status = file.Read(block.data(), body.offset, static_cast<long>(body.size), nullptr);
+    if (status != kStatusOK)
+        return status;
+    if (!isHostOrder(file.Info()))
+        swapHeader(block);
+    return IsOverviewBlock(block) ? kFound : kStatusParameterError;
+}
+
+/// The prefix and the header of an older overview are not interpreted: the file says how many frames it has.
+std::int32_t readOlder(CAudioFileIO& file, std::int64_t frames, KTMem& block)
+{
+    Body body;
+    const std::int32_t found = findBody(file, kOlderOverview, body);
+    if (found != kFound)
+        return found;
+    const std::size_t size = OverviewBlockSize(frames);
+    if (frames < 1 || body.size != static_cast<std::int64_t>(size) + kOlderPrefixSize)
+        return kStatusParameterError;
+    if (!block.allocate(size))
+        return kStatusOutOfMemory;
+    const std::int64_t start = body.offset + kOlderPrefixSize + std::int64_t{kOverviewHeaderSize};
+    OverviewPoint* points = OverviewPointsOf(block);
+    const std::size_t count = OverviewPoints(block);
+    const std::int32_t status = file.Read(points, start, static_cast<long>(count * sizeof(OverviewPoint)), nullptr);
+    if (status != kStatusOK)
+        return status;
+    std::for_each(points, points + count, [](OverviewPoint& point) { std::swap(point.minimum, point.maximum); });
+    SetOverviewFrames(block, frames);
+    return kFound;
+}
+
+/// 1 read, 0 none stored, or an error.
+std::int32_t readOverview(CAudioFileIO& file, std::int64_t frames, KTMem& block)
+{
+    if (!isAccepted(file.Info()))
+        return kStatusParameterError;
+    if (file.Info().fileType == kCaff)
+        return readCAF(file, frames, block);
+    const std::int32_t result = readPlain(file, frames, block);
+    return result == kNotFound ? readOlder(file, frames, block) : result;
+}
+
+} // namespace
+
+std::int32_t WriteOverviewToAudioFile(const CFileRef& ref, KTMem* overview, long frames, bool* stored)
+{
+    bool ignored = false;
+    bool& isStored = stored != nullptr ? *stored : ignored;
+    isStored = false;
+    if (overview == nullptr || !IsOverviewBlock(*overview))
+        return kStatusParameterError;
+    CAudioFileIO file;
+    if (const std::int32_t status = file.Open(ref, kFileIOReadWrite); status != kStatusOK)
+        return status;
+    const AudioFileInfo& info = file.Info();
+    const std::int64_t covered = frames > 0 ? frames : info.frames;
+    std::int32_t status = kStatusParameterError;
+    if (isAccepted(info) && overview->size() == OverviewBlockSize(covered))
+        status = info.fileType == kCaff ? writeCAF(file, *overview, isStored) : writeChunked(file, *overview, isStored);
+    const std::int32_t closed = file.Close();
+    return status != kStatusOK ? status : closed;
+}
+
+std::unique_ptr<KTMem> ReadOverviewFromAudioFile(const CFileRef& ref, long frames, std::int32_t* status)
+{
+    CAudioFileIO file;
+    auto block = std::make_unique<KTMem>();
+    std::int32_t result = file.Open(ref, 0);
+    if (result == kStatusOK)
+        result = readOverview(file, frames > 0 ? frames : file.Info().frames, *block);
+    if (status != nullptr)
+        *status = result == kFound ? kStatusOK : result;
+    return result == kFound ? std::move(block) : nullptr;
+}
+
+CFileRef GetMetadataFileRefForAudioFile(const CFileRef& ref)
+{
+    CFileRef metadata(ref);
+    metadata.ReplaceExtensionBy("ktmd");
+    return metadata;
+}

@@ -1,0 +1,267 @@
+#include "loops/overview/MDOverview.h"
+
+#include "OverviewImages.h"
+
+#include <gtest/gtest.h>
+
+#include <limits>
+
+namespace {
+
+using Samples = std::vector<std::int8_t>;
+
+// The points of 8-bit samples added at once, in a block sized for them.
+Points pointsOfBytes(const Samples& samples, int channels)
+{
+    const long frames = static_cast<long>(samples.size()) / channels;
+    KTMem block(OverviewBlockSize(frames));
+    MDOverview overview(&block);
+    overview.Add(samples.data(), 0, frames, channels, 1, 0);
+    return pointsOf(*overview.Finalize());
+}
+
+Samples ramp()
+{
+    Samples samples(3 * 256);
+    for (std::size_t i = 0; i < samples.size(); ++i)
+        samples[i] = static_cast<std::int8_t>(i / 4);
+    return samples;
+}
+
+// One sample of 100 in silence.
+Samples click(std::size_t at)
+{
+    Samples samples(2 * 256);
+    samples[at] = 100;
+    return samples;
+}
+
+Samples alternating(std::size_t count, std::int8_t even, std::int8_t odd)
+{
+    Samples samples(count);
+    for (std::size_t i = 0; i < count; ++i)
+        samples[i] = i % 2 == 0 ? even : odd;
+    return samples;
+}
+
+TEST(MDOverview, KnownPicturesOfKnownSignals)
+{
+    const struct {
+        const char* name;
+        Samples samples;
+        int channels;
+        Points points;
+    } cases[] = {
+        {"square", alternating(512, -90, 90), 1, {{-90, 90}, {-90, 90}}},
+        {"ramp", ramp(), 1, {{0, 63}, {0, 127}, {-128 + 1, 0}}},
+        {"always above zero", Samples(256, 50), 1, {{0, 50}}},
+        {"click, first of a point", click(256), 1, {{0, 0}, {0, 100}}},
+        {"click, last of a point", click(255), 1, {{0, 100}, {0, 0}}},
+        {"click at the end", click(511), 1, {{0, 0}, {0, 100}}},
+        {"full-scale negative", Samples(300, -128), 1, {{-127, 0}, {-127, 0}}},
+        {"left only", alternating(4, 60, 0), 2, {{0, 60}}},
+        {"left only, negative", alternating(4, -60, 0), 2, {{0, 60}}},
+        {"right only, full scale", alternating(600, 0, -128), 2, {{-127, 0}, {-127, 0}}},
+        {"left full-scale negative", alternating(2, -128, 1), 2, {{-1, 127}}},
+        {"three channels are folded", {1, -2, 30, 4, -50, 6}, 3, {{-50, 30}}},
+    };
+    for (const auto& [name, samples, channels, points] : cases)
+        EXPECT_EQ(pointsOfBytes(samples, channels), points) << name;
+}
+
+TEST(MDOverview, TheBlockIsAsLongAsItsFramesNeed)
+{
+    const struct {
+        long frames;
+        const char* hex;
+    } cases[] = {{1, "01000000000000000001"}, {256, "00010000000000000001"}, {257, "010100000000000000010001"}};
+    const Samples samples(257, 1);
+    for (const auto& [frames, hex] : cases) {
+        KTMem block(100);
+        MDOverview overview(&block);
+        overview.Add(samples.data(), 0, frames, 1, 1, 1);
+        EXPECT_EQ(overview.Finalize(), &block);
+        EXPECT_EQ(toHex(bytesOf(block)), hex);
+        EXPECT_TRUE(IsOverviewBlock(block));
+        EXPECT_EQ(overview.Finalize(), nullptr);
+    }
+}
+
+TEST(MDOverview, TakesTheFirstOrTheLastByteOfAStride)
+{
+    const Samples samples{10, 20, 30, 40, 50, 60}; // two samples of three bytes
+    for (const auto& [firstByte, maximum] : {std::pair{0, 60}, {1, 40}, {7, 40}}) {
+        KTMem block(10);
+        MDOverview overview(&block);
+        overview.Add(samples.data(), 0, 2, 1, 3, firstByte);
+        EXPECT_EQ(pointsOf(block), (Points{{0, maximum}})) << firstByte;
+    }
+}
+
+TEST(MDOverview, AnotherStartBeginsAPointAnew)
+{
+    const Samples loud(300, 100);
+    const Samples quiet(300, 5);
+    KTMem block(OverviewBlockSize(600));
+    MDOverview overview(&block);
+    overview.Add(loud.data(), 0, 300, 1, 1, 0);
+    EXPECT_EQ(OverviewFrames(block), 256u); // of the completed points
+    overview.Add(quiet.data(), 300, 10, 1, 1, 0);
+    EXPECT_EQ(pointsOf(block), (Points{{0, 100}, {0, 100}, {0, 0}})); // goes on
+    overview.Add(quiet.data(), 290, 10, 1, 1, 0);
+    EXPECT_EQ(pointsOf(block), (Points{{0, 100}, {0, 5}, {0, 0}})); // what was there is gone
+    overview.Add(loud.data(), 511, 2, 1, 1, 0);
+    EXPECT_EQ(pointsOf(block), (Points{{0, 100}, {0, 100}, {0, 100}}));
+    EXPECT_EQ(OverviewFrames(block), 512u);
+    overview.Finalize();
+    EXPECT_EQ(OverviewFrames(block), 513u);
+}
+
+TEST(MDOverview, WhatIsBeyondTheBlockIsDropped)
+{
+    const Samples samples(2000, 9);
+    const std::vector<float> floats(5000, 0.5F);
+    KTMem block(OverviewBlockSize(512));
+    MDOverview overview(&block);
+    overview.Add(samples.data(), 400, 2000, 1, 1, 0);
+    EXPECT_EQ(pointsOf(block), (Points{{0, 0}, {0, 9}}));
+    EXPECT_EQ(OverviewFrames(block), 512u);
+    overview.Add(samples.data(), 3 * 256, 1, 1, 1, 0); // not even counted
+    overview.Add(samples.data(), std::numeric_limits<long>::max(), 1, 1, 1, 0);
+    overview.Add(samples.data(), -1, 1, 1, 1, 0);
+    overview.Finalize();
+    EXPECT_EQ(OverviewFrames(block), 2400u);
+    EXPECT_EQ(block.size(), OverviewBlockSize(512));
+
+    // By slices of 2,048: the second begins beyond.
+    MDOverview sliced(&block);
+    sliced.Add(floats.data(), 0, 5000, 1);
+    sliced.Finalize();
+    EXPECT_EQ(OverviewFrames(block), 2048u);
+}
+
+TEST(MDOverview, WithoutABlockNothingHappens)
+{
+    const float sample = 1;
+    const std::int8_t byte = 1;
+    KTMem none;
+    KTMem tooSmall(7);
+    for (KTMem* block : std::initializer_list<KTMem*>{nullptr, &none, &tooSmall}) {
+        MDOverview overview(block);
+        overview.Add(&sample, 0, 1, 1);
+        overview.Add(&byte, 0, 1, 1, 1, 0);
+        overview.AddRough(&sample, 1);
+        EXPECT_EQ(overview.Finalize(), block);
+    }
+    KTMem block(10);
+    MDOverview overview(&block);
+    const std::vector<float> samples(4096, 1.0F);
+    overview.Add(samples.data(), 0, 1, 2049);
+    overview.Add(samples.data(), 0, 1, 0);
+    overview.AddStored(samples.data(), {12, false, false, std::endian::little}, 0, 1, 1);
+    overview.Add(&byte, 0, 1, 1, 0, 0);
+    EXPECT_EQ(toHex(bytesOf(block)), "00000000000000000000");
+    overview.Add(samples.data(), 0, 1, 2048);
+    EXPECT_EQ(pointsOf(block), (Points{{0, 127}}));
+}
+
+TEST(MDOverview, RoundsHalfToEvenClampsAndPassesOverNaN)
+{
+    constexpr float infinity = std::numeric_limits<float>::infinity();
+    constexpr float nan = std::numeric_limits<float>::quiet_NaN();
+    const struct {
+        float sample;
+        int value;
+    } cases[] = {{0.5F, 64},        {0.5F / 128, 0},       {1.5F / 128, 2}, {2.5F / 128, 2}, {0.50001F / 128, 1},
+                 {-1.5F / 128, -2}, {-126.5F / 128, -126}, {1.0F, 127},     {-1.0F, -127},   {126.6F / 128, 127},
+                 {infinity, 127},   {-infinity, -127},     {nan, 0},        {3e38F, 127}};
+    for (const auto& [sample, value] : cases) {
+        KTMem block(10);
+        MDOverview overview(&block);
+        overview.Add(&sample, 0, 1, 1);
+        EXPECT_EQ(pointsOf(block), (Points{{std::min(value, 0), std::max(value, 0)}})) << sample;
+    }
+}
+
+// Every 8-bit value keeps its own.
+TEST(MDOverview, EightBitAudioKeepsItsValues)
+{
+    for (int value = -127; value <= 127; ++value) {
+        KTMem block(10);
+        MDOverview overview(&block);
+        const auto stored = static_cast<unsigned char>(value + 128);
+        overview.AddStored(&stored, {8, false, true, std::endian::little}, 0, 1, 1);
+        EXPECT_EQ(pointsOf(block), (Points{{std::min(value, 0), std::max(value, 0)}}));
+    }
+}
+
+TEST(MDOverview, AnySlicesGiveWhatThePlainRoadGives)
+{
+    std::mt19937 random(1);
+    const platform::SampleFormat floatFormat{32, true, false, std::endian::native};
+    for (const int channels : {1, 2, 3, 5, 6, 8, 24, 100, 700, 1024, 2048})
+        for (int round = 0; round < 6; ++round) {
+            const auto frames = static_cast<long>(1 + random() % (channels > 24 ? 600 : 6000));
+            const Bytes stored = randomSamples(random, floatFormat,
+                                               static_cast<std::size_t>(frames) * static_cast<std::size_t>(channels));
+            const auto* samples = reinterpret_cast<const float*>(stored.data());
+            KTMem plain(OverviewBlockSize(frames));
+            MDOverview reference(&plain);
+            KTMem block(OverviewBlockSize(frames));
+            MDOverview overview(&block);
+            for (long done = 0; done < frames;) {
+                const auto count = std::min<long>(frames - done, static_cast<long>(random() % 900));
+                addPlainly(reference, samples + done * channels, done, count, channels);
+                overview.Add(samples + done * channels, done, count, channels);
+                ASSERT_EQ(bytesOf(block), bytesOf(plain)) << channels << " channels, " << done << " + " << count;
+                done += count;
+            }
+            const Bytes sliced = bytesOf(*overview.Finalize());
+            EXPECT_EQ(sliced, plainOverview(floatFormat, channels, stored)) << channels;
+        }
+}
+
+TEST(MDOverview, TheRoughPictureFollowsTheExactOneAndDecays)
+{
+    KTMem block(OverviewBlockSize(256 * 20));
+    MDOverview overview(&block);
+    std::vector<float> samples(256, 0.5F);
+    overview.AddRough(samples.data(), 256); // nothing exact yet
+    EXPECT_EQ(pointsOf(block).front(), (std::pair{0, 0}));
+
+    overview.Add(samples.data(), 0, 100, 1);
+    samples[3] = std::numeric_limits<float>::quiet_NaN();
+    overview.AddRough(samples.data(), 256); // frames 100 to 355: raises no exact point that is higher
+    EXPECT_EQ(pointsOf(block)[0], (std::pair{0, 64}));
+    EXPECT_EQ(pointsOf(block)[1], (std::pair{-63, 63}));
+    EXPECT_EQ(OverviewFrames(block), 512u);
+
+    const std::vector<float> quiet(256, -0.9F); // only what is above zero counts
+    for (int call = 0; call < 15; ++call)
+        overview.AddRough(quiet.data(), 256);
+    EXPECT_EQ(pointsOf(block)[15], (std::pair{-63, 63})); // the running peak
+    EXPECT_EQ(pointsOf(block)[17], (std::pair{0, 0}));    // which the 17th call forgets
+    const std::vector<float> loud(256 * 9, 7.0F);
+    overview.AddRough(loud.data(), 256 * 9); // to the end of the block and no further
+    EXPECT_EQ(pointsOf(block)[19], (std::pair{-127, 127}));
+    EXPECT_EQ(OverviewFrames(block), 20u * 256);
+
+    overview.Add(loud.data(), 100, 256 * 9, 1); // the exact pass takes its points back
+    EXPECT_EQ(pointsOf(block)[1], (std::pair{0, 127}));
+    EXPECT_EQ(pointsOf(block)[8], (std::pair{0, 127}));
+}
+
+TEST(MDOverview, TheRoughPictureStopsWhereTheExactOneHasPassed)
+{
+    KTMem block(OverviewBlockSize(1024));
+    MDOverview overview(&block);
+    const std::vector<float> silence(600);
+    const std::vector<float> loud(600, 1.0F);
+    overview.Add(silence.data(), 0, 10, 1);
+    overview.AddRough(loud.data(), 10); // up to frame 20
+    overview.Add(silence.data(), 0, 600, 1);
+    overview.AddRough(loud.data(), 300); // from frame 20 on: passed
+    EXPECT_EQ(pointsOf(block), (Points{{0, 0}, {0, 0}, {0, 0}, {0, 0}}));
+}
+
+} // namespace

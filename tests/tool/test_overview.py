@@ -1,0 +1,337 @@
+"""ktfiles overview: sparklines, numbers, pictures compared with the points they show, and stored overviews."""
+import json
+import math
+import os
+import pty
+import random
+import signal
+import struct
+import subprocess
+import unittest
+
+from command import KTFILES, MEDIA, CommandTest, caf, chunk, wave
+from picture import WhiteOnBlack, decoded_png, svg_waves
+
+TIME_STRIP = 27
+PICTURE = ("--colors", WhiteOnBlack.COLORS)
+
+
+def pcm(samples, channels=1, rate=8000, size=None):
+    """A 16-bit WAVE file; `size` overrides the size of its samples."""
+    body = struct.pack(f"<{len(samples)}h", *samples)
+    fmt = chunk(b"fmt ", struct.pack("<HHIIHH", 1, channels, rate, rate * channels * 2, channels * 2, 16))
+    data = chunk(b"data", body, size=size)
+    return b"RIFF" + struct.pack("<I", 4 + len(fmt) + len(data)) + b"WAVE" + fmt + data
+
+
+def click(frames, at):
+    samples = [0] * frames
+    samples[at] = 32767
+    return samples
+
+
+class Picture(CommandTest):
+    def draw(self, samples, *options, width=600, height=280, channels=1, rate=8000):
+        """The points, and the picture of them."""
+        self.write("a.wav", pcm(samples, channels, rate))
+        size = ("--width", str(width), "--height", str(height))
+        png = self.run_command("overview", "a.wav", "--png", "-", *size, *PICTURE, *options).stdout
+        self.svg = self.run_command("overview", "a.wav", "--svg", "-", *size, *options).stdout
+        return self.json("overview", "a.wav")["points"], WhiteOnBlack(png)
+
+    @staticmethod
+    def edges(low, high, height):
+        """Where a column from `low` to `high` is to begin and end."""
+        centre = (height - TIME_STRIP) / 2
+        reach = centre - min(max((height - TIME_STRIP) * 0.05, 0.5), 12)
+        top, bottom = centre - high / 127 * reach, centre - low / 127 * reach
+        return (top, bottom) if bottom - top >= 1 else ((top + bottom - 1) / 2, (top + bottom + 1) / 2)
+
+    def assert_edges(self, found, expected, slack=0.06):
+        self.assertAlmostEqual(found[0], expected[0], delta=slack)
+        self.assertAlmostEqual(found[1], expected[1], delta=slack)
+
+    def test_each_column_shows_the_extremes_of_its_points(self):
+        noise = random.Random(1)
+        frames = 256 * 1500 + 77
+        samples = [int(noise.uniform(-1, 1) * 32767 * (0.02 + abs(math.sin(i / 9000)))) for i in range(frames)]
+        samples = [min(max(sample, -32768), 32767) for sample in samples]
+        for width, height in ((600, 280), (217, 90)):
+            points, picture = self.draw(samples, width=width, height=height)
+            self.assertEqual((picture.width, picture.height, len(points)), (width, height, 1501))
+            stairs = svg_waves(self.svg)[0][0]
+            for x in range(width):
+                first = x * frames / 256 / width
+                shown = points[int(first + 1e-9):math.ceil(first + frames / 256 / width - 1e-9)]
+                expected = self.edges(min(p[0] for p in shown), max(p[1] for p in shown), height)
+                with self.subTest(x=x, width=width):
+                    # Behind a peak that ends within a pixel stands the lighter of two pixels alone: half a pixel.
+                    self.assert_edges(picture.extent(x), expected, slack=0.55)
+                    ends = [y for corner_x, y in stairs if corner_x == x + 1]
+                    self.assertTrue(any(abs(y - expected[0]) < 0.02 for y in ends), (ends, expected))
+                    self.assertTrue(any(abs(y - expected[1]) < 0.02 for y in ends), (ends, expected))
+
+    def test_known_signals(self):
+        full = self.edges(-127, 127, 280)
+        upper, lower, silent = self.edges(0, 127, 280), self.edges(-127, 0, 280), self.edges(0, 0, 280)
+        square = [32767 if i // 2560 % 2 == 0 else -32768 for i in range(25600)]
+        whole = [32767, -32768] * 12800
+        for name, samples, channels, expected in (
+                ("full scale", whole, 1, lambda x: full),
+                ("square", square, 1, lambda x: upper if x // 60 % 2 == 0 else lower),
+                ("negative full scale", [-32768] * 25600, 1, lambda x: lower),
+                ("left only", [v for _ in range(25600) for v in (-32768, 0)], 2, lambda x: upper),
+                ("right only", [v for _ in range(25600) for v in (0, 32767)], 2, lambda x: lower),
+                ("silence", [0] * 25600, 1, lambda x: silent)):
+            with self.subTest(name):
+                _, picture = self.draw(samples, channels=channels)
+                for x in range(6, 600, 12):  # in the middle of points, away from the square's flanks
+                    if name != "square" or 6 <= x % 60 < 54:
+                        self.assert_edges(picture.extent(x), expected(x))
+
+    def test_silence_is_a_hairline(self):
+        for width, frames in ((600, 25600), (30, 25600), (600, 1)):
+            _, picture = self.draw([0] * frames, width=width)
+            for x in range(width):
+                self.assertAlmostEqual(sum(picture.column(x)[:-TIME_STRIP]), 1, delta=0.05)
+
+    def test_a_ramp_rises(self):
+        points, picture = self.draw([i * 32767 // 25600 for i in range(25600)])
+        tops = [picture.extent(x)[0] for x in range(600)]
+        self.assertTrue(all(a >= b - 0.03 for a, b in zip(tops, tops[1:])))
+        for i, point in enumerate(points):
+            self.assertAlmostEqual(tops[i * 6 + 3], self.edges(*point, 280)[0], delta=1.2)
+
+    def test_a_click_is_where_it_was(self):
+        # 45 ms of 8 points over 600 columns; the peak of the drawing lies in the point of the click, and nowhere else.
+        frames = 1984
+        for at in (0, 255, 256, 511, 512, 1000, 1791, 1792, frames - 1):
+            with self.subTest(at=at):
+                points, picture = self.draw(click(frames, at), rate=44100)
+                tops = [picture.extent(x)[0] for x in range(600)]
+                first, end = (at // 256) * 256 * 600 / frames, min(at // 256 * 256 + 256, frames) * 600 / frames
+                self.assertAlmostEqual(min(tops), self.edges(0, 127, 280)[0], delta=0.1)
+                self.assertTrue(all(first <= x + 1 and x <= end for x in range(600) if tops[x] < min(tops) + 0.5))
+                for i, point in enumerate(points):
+                    middle = (i * 256 + min(i * 256 + 256, frames)) / 2 * 600 / frames
+                    self.assertAlmostEqual(tops[int(middle)], self.edges(*point, 280)[0], delta=0.6)
+
+    def test_a_range_is_cut_out(self):
+        points, picture = self.draw(click(80000, 40000), "--start", "0:04", "--end", "6", width=60)
+        tops = [picture.extent(x)[0] for x in range(60)]
+        self.assertTrue(29 <= tops.index(min(tops)) <= 31)
+        _, beyond = self.draw(click(80000, 40000), "--start", "4", "--end", "100:00", width=60)
+        tops = [beyond.extent(x)[0] for x in range(60)]
+        self.assertTrue(9 <= tops.index(min(tops)) <= 11)
+        self.assertIn("ends at 0:10.000", self.failure("overview", "a.wav", "--svg", "-", "--start", "10"))
+
+    def test_times_along_the_axis(self):
+        for seconds, rate, options, expected in (
+                (0.0226, 44100, (), ["0 ms", "5 ms", "10 ms", "15 ms", "20 ms"]),
+                (10, 8000, (), ["0:00", "0:02", "0:04", "0:06", "0:08", "0:10"]),
+                (10, 8000, ("--start", "3", "--end", "4.5"), ["0:03.0", "0:03.5", "0:04.0", "0:04.5"]),
+                (1, 192000, ("--start", "0.5", "--end", "0.5002"), ["500.00 ms", "500.05 ms", "500.10 ms", "500.15 ms",
+                                                                    "500.20 ms"]),
+                (1 / 192000, 192000, (), ["0.000 ms", "0.001 ms", "0.002 ms", "0.003 ms", "0.004 ms", "0.005 ms"])):
+            with self.subTest(expected):
+                self.draw([0] * max(round(seconds * rate), 1), *options, rate=rate)
+                self.assertEqual(svg_waves(self.svg)[1], expected)
+
+    def test_twelve_hours(self):
+        seconds = 12 * 3600
+        header = pcm([], rate=100, size=seconds * 200)
+        path = self.write("long.wav", header[:4] + struct.pack("<I", seconds * 200 + 36) + header[8:])
+        os.truncate(path, len(header) + seconds * 200)
+        with open(path, "r+b") as file:
+            file.seek(len(header) + seconds * 100 + 2000)  # in the midst of a point of one column only
+            file.write(struct.pack("<h", 32767))
+        png = self.run_command("overview", "long.wav", "--png", "-", *PICTURE).stdout
+        picture = WhiteOnBlack(png)
+        tops = [picture.extent(x)[0] for x in range(picture.width)]
+        self.assertEqual([x for x in range(picture.width) if tops[x] < 100], [900])
+        self.assert_edges(picture.extent(900), self.edges(0, 127, 280), slack=0.55)
+        labels = svg_waves(self.run_command("overview", "long.wav", "--svg", "-").stdout)[1]
+        self.assertEqual(labels, [f"{hour}:00:00" for hour in range(13)])
+
+    def test_scale(self):
+        _, picture = self.draw([32767, -32768] * 12800, "--scale")
+        self.assertEqual(svg_waves(self.svg)[1][:8], ["0", "−6", "−12", "−∞", "−12", "−6", "0", "dB"])
+        self.assertTrue(all(value < 0.02 for x in range(44) for value in picture.column(x)))
+        self.assert_edges(picture.extent(44), self.edges(-127, 127, 280))
+        # 0 dB and its half are marked where the wave of that level ends.
+        red = [y for y, row in enumerate(picture.rows) if row[42][0] > 200]
+        centre, reach = 126.5, self.edges(0, 0, 280)[0] + 0.5 - self.edges(0, 127, 280)[0]
+        for level in (1, 0.5, 0, -0.5, -1):
+            self.assertTrue(any(abs(y + 0.5 - (centre - level * reach)) <= 1 for y in red), (level, red))
+
+    def test_low_pictures_have_no_axis(self):
+        _, picture = self.draw([32767, -32768] * 1280, width=16, height=8)
+        self.assertTrue(all(row[x][1] > 200 for row in picture.rows[1:-1] for x in range(16)))
+        self.assertEqual(svg_waves(self.svg)[1], [])
+
+    def test_colors(self):
+        self.write("a.wav", pcm([0] * 5120))
+        corner = {}
+        for colors in ("night", "day", "f06,none", "#123,#FEDCBA", "000000,ffffff,808080"):
+            png = self.run_command("overview", "a.wav", "--png", "-", "--colors", colors).stdout
+            corner[colors] = decoded_png(png)[0][0]
+        self.assertNotEqual(corner["night"], corner["day"])
+        self.assertEqual(corner["f06,none"][3], 0)
+        self.assertEqual(corner["#123,#FEDCBA"], (0xFE, 0xDC, 0xBA, 255))
+        svg = self.run_command("overview", "a.wav", "--svg", "-", "--colors", "f06,none").stdout
+        self.assertNotIn(b"<rect", svg)
+        self.assertIn(b"#ff0066", svg)
+
+
+class Output(CommandTest):
+    def test_forms(self):
+        self.write("a.wav", pcm([0] * 256 + [32767] * 256 + [-16384, 8192]))
+        self.write("b&<é.wav", pcm([0] * 100))
+        self.write("bad.wav", b"RIFF")
+        one = {"path": "a.wav", "frames": 514, "framesPerPoint": 256, "points": [[0, 0], [0, 127], [-64, 32]]}
+        self.assertEqual(self.json("overview", "a.wav"), one)
+        several = self.json("overview", "a.wav", "bad.wav", "b&<é.wav", status=1)
+        self.assertEqual([several[0], *(set(item) for item in several[1:])], [one, {"path", "error"}, set(one)])
+        self.assertEqual(self.lines("overview", "a.wav")[0].split("\t")[:5], ["a.wav", "0.064250", "514", "-64", "127"])
+        self.assertEqual(self.lines("overview", "--quiet", "a.wav"), [])
+        self.assertIn(b"<title>b&amp;&lt;\xc3\xa9.wav</title>",
+                      self.run_command("overview", "b&<é.wav", "--svg", "-").stdout)
+
+    def test_sparkline(self):
+        self.write("a.wav", pcm([32767] * 2560 + [0] * 2560 + [16000] * 2560))
+        self.write("音" * 30 + ".wav", pcm([0] * 8000 * 61))
+        text, status = self.on_terminal("overview", "a.wav", "音" * 30 + ".wav", NO_COLOR="1")
+        first, second = text.splitlines()
+        self.assertEqual(status, 0)
+        self.assertRegex(first, r"^a\.wav +0:00\.960  █{13}▁{13}▄{13}$")
+        self.assertRegex(second, r"^…音{10}\.wav +1:01\.000  ▁{39}$")
+        self.assertIn("\x1b[36m", self.on_terminal("overview", "a.wav", NO_COLOR="")[0])
+
+    def test_pictures_are_written_whole_or_not_at_all(self):
+        audio = pcm([1000] * 5120)
+        self.write("a.wav", audio)
+        old = self.write("old.png", b"old")
+        os.chmod(old, 0o640)
+        os.symlink("old.png", self.folder / "link.png")
+        self.assertEqual(self.lines("overview", "a.wav", "--png", "link.png", "--svg", "a.svg"),
+                         ["a.wav: drawn to link.png, 1800 x 280", "a.wav: drawn to a.svg, 1800 x 280"])
+        self.assertEqual(os.stat(old).st_mode & 0o777, 0o640)
+        self.assertTrue(os.path.islink(self.folder / "link.png"))
+        self.assertEqual(len(decoded_png(old.read_bytes())), 280)
+        for out, why in (("a.wav", "over the file itself"), (".", "is a folder"), ("/dev/full", "disk full"),
+                         ("missing/a.png", "folder")):
+            self.assertIn(why, self.failure("overview", "a.wav", "--png", out))
+        self.assertEqual((self.folder / "a.wav").read_bytes(), audio)
+        with open("/dev/full", "wb") as full:
+            result = subprocess.run([KTFILES, "overview", self.folder / "a.wav", "--png", "-"], stdout=full,
+                                    stderr=subprocess.DEVNULL)
+        self.assertEqual(result.returncode, 1)
+        self.assert_no_litter("a.svg", "a.wav", "link.png", "old.png")
+
+    def test_files_without_an_overview(self):
+        self.write("cut.wav", pcm([5000] * 1000)[:-1000])
+        result = self.run_command("overview", "cut.wav")
+        self.assertIn("1000 bytes of which are missing", result.stderr.decode())
+        self.assertEqual(result.stdout.split(b"\t")[2], b"500")
+        self.assertEqual(self.run_command("overview", "cut.wav", "--quiet").stderr, b"")
+        for name, content, why in (("none.wav", pcm([]), "holds no sound"), ("text.wav", b"text" * 100, "no container"),
+                                   ("wide.wav", pcm([0] * 4098, 2049), "2049 channels"),
+                                   ("slow.caf", caf().replace(struct.pack(">d", 44100), struct.pack(">d", 1e-300)),
+                                    "sample rate of 1e-300 Hz"),
+                                   ("tone-adpcm.wav", (MEDIA / "tone-adpcm.wav").read_bytes(), "compressed")):
+            self.write(name, content)
+            for option in ("--json", "--store"):
+                self.assertIn(why, self.failure("overview", name, option))
+            self.assertEqual((self.folder / name).read_bytes(), content)
+
+    def test_mistakes(self):
+        self.write("a.wav", wave())
+        for arguments in ((), ("a.wav", "a.wav", "--png", "x"), ("a.wav", "--png", "x", "--svg", "x"),
+                          ("a.wav", "--png", "-", "--json"), ("a.wav", "--width", "100"), ("a.wav", "--start", "1"),
+                          ("a.wav", "--svg", "x", "--width", "15"), ("a.wav", "--svg", "x", "--height", "5000"),
+                          ("a.wav", "--svg", "x", "--start", "2", "--end", "2"), ("a.wav", "--in-place"),
+                          *(("a.wav", "--svg", "x", "--start", time) for time in ("-1", "1:60", "1:2:3:4", "x", "")),
+                          *(("a.wav", "--svg", "x", "--colors", colors)
+                            for colors in ("red", "fff", "fff,1234", "1,2,3,4")),
+                          ("a.wav", "--store", "--stored")):
+            with self.subTest(arguments):
+                self.run_command("overview", *arguments, status=2)
+        self.assert_no_litter("a.wav")
+
+
+class Store(CommandTest):
+    SOUNDS = ("tone-16.wav", "tone-16.aiff", "tone-sowt.aifc", "bell-16-be.caf", "pluck-24-le.caf", "kick-24-rf64.wav")
+
+    def test_stored_overviews_are_read_back(self):
+        for name in self.SOUNDS:
+            with self.subTest(name):
+                original = (MEDIA / name).read_bytes()
+                path = self.write(name, original)
+                points = self.json("overview", name)["points"]
+                self.assertIn("has no stored overview", self.failure("overview", "--stored", name))
+                count = f"{len(points)} points"
+                self.assertEqual(self.lines("overview", "--store", "--dry-run", name),
+                                 [f"{name}: would store its overview, {count}"])
+                self.assertEqual(path.read_bytes(), original)
+                self.assertIn(f"stored its overview, {count}; backup",
+                              self.lines("overview", "--store", "--backup", name)[0])
+                self.assertEqual((self.folder / (name + ".bak")).read_bytes(), original)
+                self.assertEqual(self.json("overview", "--stored", name)["points"], points)
+                self.assertEqual(self.json("overview", name)["points"], points)
+                stored = path.read_bytes()
+                again = self.json("overview", "--store", "--in-place", name)
+                self.assertEqual((again["stored"], again["changed"], again["points"]), (True, False, points))
+                self.assertEqual(path.read_bytes(), stored)
+        self.assert_no_litter(*self.SOUNDS, *(name + ".bak" for name in self.SOUNDS))
+
+    def test_silence_in_a_caf_file(self):
+        path = self.write("a.caf", caf(samples=bytes(1000)))
+        self.assertEqual(self.lines("overview", "--store", "a.caf"),
+                         ["a.caf: unchanged: a CAF file stores no overview of silence"])
+        self.assertEqual(path.read_bytes(), caf(samples=bytes(1000)))
+
+    def test_a_stale_overview_is_replaced(self):
+        for where in ("copy", "in place"):
+            options = ("--in-place",) if where == "in place" else ()
+            self.write("a.wav", wave(chunk(b"LGWV", struct.pack("<IIbb", 100, 0, -3, 3)), frames=100))
+            self.assertEqual(self.json("overview", "--stored", "a.wav")["points"], [[-3, 3]])
+            self.assertTrue(self.json("overview", "--store", "a.wav", *options)["changed"])
+            self.assertNotEqual(self.json("overview", "--stored", "a.wav")["points"], [[-3, 3]])
+            ids = [item["id"] for item in self.json("chunks", "a.wav")["chunks"]]
+            self.assertEqual(ids.count("LGWV"), 1)
+
+    def test_stored_overviews_that_do_not_fit(self):
+        for name, content in (
+                ("long.wav", wave(chunk(b"LGWV", bytes(12)), frames=100)),
+                ("older.wav", wave(chunk(b"ovwf", bytes(31)), frames=100)),
+                ("zero.caf", caf((b"ovvw", struct.pack(">IIhh", 0, 0, 0, 256)))),
+                ("cut.wav", wave(chunk(b"LGWV", bytes(10), size=4000), frames=100))):
+            self.write(name, content)
+            with self.subTest(name):
+                self.failure("overview", "--stored", name)
+                self.assertEqual((self.folder / name).read_bytes(), content)
+
+    def test_interruption_leaves_the_file_alone(self):
+        # So many channels that reading takes minutes, and the overview little memory; the file is a hole.
+        header = pcm([], channels=1024)
+        length = 60 << 30
+        ds64 = chunk(b"ds64", struct.pack("<QQQI", length - 8, length - 80, 0, 0))
+        path = self.write("a.wav", b"RF64\xff\xff\xff\xffWAVE" + ds64 + header[12:36] + b"data\xff\xff\xff\xff")
+        begin = path.read_bytes()
+        os.truncate(path, length)
+        process, terminal = pty.fork()
+        if process == 0:
+            os.chdir(self.folder)
+            os.execv(KTFILES, [KTFILES, "overview", "--store", "--in-place", "a.wav"])
+        self.assertIn(b"reading ", os.read(terminal, 1000))  # the progress bar, after a second
+        os.kill(process, signal.SIGINT)
+        self.assertEqual(os.waitstatus_to_exitcode(os.waitpid(process, 0)[1]), -signal.SIGINT)
+        os.close(terminal)
+        self.assert_no_litter("a.wav")
+        with open(path, "rb") as file:
+            self.assertEqual(file.read(len(begin)), begin)
+        self.assertEqual(os.path.getsize(path), length)
+
+
+if __name__ == "__main__":
+    unittest.main()

@@ -1,0 +1,18 @@
+// The edit of `ktfiles overview --store`.
+#pragma once
+
+#include "FileOverview.h"
+#include "SafeEdit.h"
+
+#include <string>
+
+/// What storing came to.
+struct StoreResult {
+    bool stored = false;  // the file holds its overview, or with --dry-run would
+    bool changed = false; // it did not before
+    std::string backup;
+};
+
+/// Stores the overview in the file, in the place of the one that it has. The edit must have begun before the overview
+/// was computed. Of silence a CAF file keeps none. Throws Failure.
+StoreResult storeOverview(SafeEdit& edit, FileOverview& overview, const EditOptions& options);

@@ -1,0 +1,182 @@
+// ADM documents: parsing against bare libxml2, which is pushed the same bytes and calls functions that do nothing; and
+// looking IDs up.
+#include "ADMDocuments.h"
+#include "adm/ADMDocument.h"
+
+#include <benchmark/benchmark.h>
+
+#include <libxml/parser.h>
+
+#include <algorithm>
+#include <array>
+#include <cstdio>
+#include <cstdlib>
+#include <ctime>
+#include <filesystem>
+#include <fstream>
+#include <random>
+#include <string>
+#include <vector>
+
+namespace {
+
+constexpr std::size_t kPiece = 64 * 1024;
+constexpr ADMDocumentShape kLarge{128, 4000}; // some 200 MB
+constexpr ADMDocumentShape kSmall{8, 300};    // some 1 MB
+
+class FileStream : public platform::InputStream {
+public:
+    explicit FileStream(const std::string& path) : file_(std::fopen(path.c_str(), "rb")) {}
+    ~FileStream() override { std::fclose(file_); }
+    std::ptrdiff_t read(std::span<std::byte> buffer) override
+    {
+        return static_cast<std::ptrdiff_t>(std::fread(buffer.data(), 1, buffer.size(), file_));
+    }
+
+private:
+    std::FILE* file_;
+};
+
+/// A document in a temporary file, which is removed when the process ends.
+class DocumentFile {
+public:
+    explicit DocumentFile(ADMDocumentShape shape)
+    {
+        path_ = std::filesystem::temp_directory_path() / "ktfiles-bench-XXXXXX";
+        const int descriptor = mkstemp(path_.data());
+        std::FILE* file = descriptor < 0 ? nullptr : fdopen(descriptor, "wb");
+        if (file == nullptr)
+            std::abort();
+        ADMDocumentStream document(shape);
+        std::array<std::byte, kPiece> piece;
+        for (std::ptrdiff_t count; (count = document.read(piece)) > 0; size_ += static_cast<std::size_t>(count))
+            if (std::fwrite(piece.data(), 1, static_cast<std::size_t>(count), file) != static_cast<std::size_t>(count))
+                std::abort();
+        std::fclose(file);
+    }
+    ~DocumentFile() { std::filesystem::remove(path_); }
+    DocumentFile(const DocumentFile&) = delete;
+    DocumentFile& operator=(const DocumentFile&) = delete;
+
+    const std::string& path() const { return path_; }
+    std::size_t size() const { return size_; }
+
+private:
+    std::string path_;
+    std::size_t size_ = 0;
+};
+
+double cpuSeconds()
+{
+    timespec now{};
+    clock_gettime(CLOCK_PROCESS_CPUTIME_ID, &now);
+    return static_cast<double>(now.tv_sec) + static_cast<double>(now.tv_nsec) * 1e-9;
+}
+
+bool parseBare(const std::string& path)
+{
+    xmlSAXHandler sax{};
+    sax.initialized = XML_SAX2_MAGIC;
+    sax.startElementNs = [](void*, const xmlChar*, const xmlChar*, const xmlChar*, int, const xmlChar**, int, int,
+                            const xmlChar**) {};
+    sax.endElementNs = [](void*, const xmlChar*, const xmlChar*, const xmlChar*) {};
+    sax.characters = sax.ignorableWhitespace = sax.cdataBlock = [](void*, const xmlChar*, int) {};
+    FileStream stream(path);
+    xmlParserCtxtPtr context = xmlCreatePushParserCtxt(&sax, nullptr, nullptr, 0, nullptr);
+    xmlCtxtUseOptions(context, XML_PARSE_NONET);
+    std::array<std::byte, kPiece> piece;
+    for (std::ptrdiff_t count; (count = stream.read(piece)) > 0;)
+        xmlParseChunk(context, reinterpret_cast<const char*>(piece.data()), static_cast<int>(count), 0);
+    xmlParseChunk(context, nullptr, 0, 1);
+    const bool isWellFormed = context->wellFormed != 0;
+    if (context->myDoc != nullptr)
+        xmlFreeDoc(context->myDoc);
+    xmlFreeParserCtxt(context);
+    return isWellFormed;
+}
+
+/// A number of /proc/self/status in MiB.
+double statusMiB(const std::string& key)
+{
+    std::ifstream status("/proc/self/status");
+    for (std::string line; std::getline(status, line);)
+        if (line.starts_with(key))
+            return std::strtod(line.c_str() + key.size(), nullptr) / 1024;
+    return 0;
+}
+
+/// The peak counts from here on.
+void resetPeak()
+{
+    std::ofstream("/proc/self/clear_refs") << 5;
+}
+
+/// Both take turns, so that page cache and processor treat them alike, and the best turn of each counts: others work on
+/// the machine. The time of the benchmark is that of our own, taking the document down again included.
+void parseDocuments(benchmark::State& state, ADMDocumentShape shape, int times)
+{
+    const DocumentFile file(shape);
+    double bare = 1e9, ours = 1e9, peak = 0;
+    for (auto _ : state) {
+        double start = cpuSeconds();
+        for (int i = 0; i < times; ++i)
+            if (!parseBare(file.path()))
+                state.SkipWithError("the document is not well-formed");
+        bare = std::min(bare, cpuSeconds() - start);
+
+        resetPeak();
+        start = cpuSeconds();
+        for (int i = 0; i < times; ++i) {
+            ADMDocument document(std::make_unique<FileStream>(file.path()));
+            if (!document.parse() || document.audioObjects().size() != static_cast<std::size_t>(shape.objects))
+                state.SkipWithError("the document is not read");
+        }
+        const double seconds = cpuSeconds() - start;
+        peak = std::max(peak, statusMiB("VmHWM:"));
+        ours = std::min(ours, seconds);
+        state.SetIterationTime(seconds / times);
+    }
+    const double megabytes = static_cast<double>(file.size()) * 1e-6 * times;
+    state.counters["bare_MB_per_s"] = megabytes / bare;
+    state.counters["MB_per_s"] = megabytes / ours;
+    state.counters["times_bare"] = bare / ours; // at least 0.6, for 1 MB at least 0.55
+    state.counters["peak_MiB"] = peak;          // at most 150
+    state.counters["file_MB"] = static_cast<double>(file.size()) * 1e-6;
+}
+
+void ParseLargeADM(benchmark::State& state)
+{
+    parseDocuments(state, kLarge, 1);
+}
+BENCHMARK(ParseLargeADM)->UseManualTime()->Unit(benchmark::kMillisecond)->Iterations(10);
+
+void ParseSmallADM(benchmark::State& state)
+{
+    parseDocuments(state, kSmall, 50);
+}
+BENCHMARK(ParseSmallADM)->UseManualTime()->Unit(benchmark::kMillisecond)->Iterations(10);
+
+/// A million track UIDs, looked up in an order of chance.
+void FindADMElement(benchmark::State& state)
+{
+    constexpr std::size_t count = 1000000;
+    ADMDocument document(nullptr);
+    std::vector<std::string> ids(count);
+    for (std::size_t i = 0; i < count; ++i) {
+        std::array<char, 32> id{};
+        std::snprintf(id.data(), id.size(), "ATU_%08zX", i + 1);
+        ids[i] = id.data();
+        document.addAudioTrackUID(ADMAudioTrackUID::audioTrackUIDWithAttributes({{"UID", ids[i]}}));
+    }
+    std::shuffle(ids.begin(), ids.end(), std::mt19937(1));
+    for (auto _ : state) {
+        const double start = cpuSeconds();
+        for (const std::string& id : ids)
+            if (document.findADMElementRef(id) == nullptr)
+                state.SkipWithError("an ID is not found");
+        state.SetIterationTime((cpuSeconds() - start) / count); // at most 150 ns
+    }
+}
+BENCHMARK(FindADMElement)->UseManualTime()->Unit(benchmark::kNanosecond)->Iterations(10);
+
+} // namespace

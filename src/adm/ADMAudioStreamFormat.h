@@ -1,0 +1,66 @@
+// A stream format: tracks that are decoded together, and what they give.
+#pragma once
+
+#include "adm/ADMElement.h"
+#include "adm/ADMReferences.h"
+
+#include <cstdint>
+#include <memory>
+#include <optional>
+#include <string>
+#include <string_view>
+#include <utility>
+#include <vector>
+
+class ADMAudioChannelFormat;
+class ADMAudioPackFormat;
+class ADMAudioTrackFormat;
+
+class KT_EXPORT ADMAudioStreamFormat : public ADMElement {
+public:
+    /// `audioStreamFormatWithAttributes:`
+    static std::unique_ptr<ADMAudioStreamFormat>
+    audioStreamFormatWithAttributes(const platform::XMLAttributes& attributes);
+    explicit ADMAudioStreamFormat(const platform::XMLAttributes& attributes);
+
+    const std::string& audioStreamFormatID() const { return audioStreamFormatID_; }
+    void setAudioStreamFormatID(std::string value) { audioStreamFormatID_ = std::move(value); }
+    const std::string& audioStreamFormatName() const { return audioStreamFormatName_; }
+    void setAudioStreamFormatName(std::string value) { audioStreamFormatName_ = std::move(value); }
+    /// 1: PCM.
+    std::uint32_t format() const { return format_; }
+    void setFormat(std::uint32_t value) { format_ = value; }
+    const std::optional<std::string>& audioChannelFormatIDRef() const { return audioChannelFormat_.id; }
+    void setAudioChannelFormatIDRef(std::optional<std::string> value) { audioChannelFormat_.id = std::move(value); }
+    ADMAudioChannelFormat* audioChannelFormat() const { return audioChannelFormat_.element; }
+    void setAudioChannelFormat(ADMAudioChannelFormat* value) { audioChannelFormat_.element = value; }
+    const std::optional<std::string>& audioPackFormatIDRef() const { return audioPackFormat_.id; }
+    void setAudioPackFormatIDRef(std::optional<std::string> value) { audioPackFormat_.id = std::move(value); }
+    ADMAudioPackFormat* audioPackFormat() const { return audioPackFormat_.element; }
+    void setAudioPackFormat(ADMAudioPackFormat* value) { audioPackFormat_.element = value; }
+    const std::vector<std::string>& audioTrackFormatIDRefs() const { return audioTrackFormats_.ids; }
+    void setAudioTrackFormatIDRefs(std::vector<std::string> value) { audioTrackFormats_.ids = std::move(value); }
+    const std::vector<ADMAudioTrackFormat*>& audioTrackFormats() const { return audioTrackFormats_.elements; }
+    void setAudioTrackFormats(std::vector<ADMAudioTrackFormat*> value)
+    {
+        audioTrackFormats_.elements = std::move(value);
+    }
+
+    std::string_view elementName() const override { return "audioStreamFormat"; }
+    std::string elementID() const override { return audioStreamFormatID_; }
+    void setSubElement(std::string_view name, std::string_view value,
+                       const platform::XMLAttributes& attributes) override;
+    void addSubElement_audioChannelFormatIDRef(std::string_view value, const platform::XMLAttributes& attributes);
+    void addSubElement_audioPackFormatIDRef(std::string_view value, const platform::XMLAttributes& attributes);
+    void addSubElement_audioTrackFormatIDRef(std::string_view value, const platform::XMLAttributes& attributes);
+    void resolveIDRefsWithResolver(ADMElementResolver& resolver) override;
+    std::string description() const override;
+
+private:
+    std::string audioStreamFormatID_;
+    std::string audioStreamFormatName_;
+    std::uint32_t format_ = 0;
+    ADMReference<ADMAudioChannelFormat> audioChannelFormat_;
+    ADMReference<ADMAudioPackFormat> audioPackFormat_;
+    ADMReferenceList<ADMAudioTrackFormat> audioTrackFormats_;
+};

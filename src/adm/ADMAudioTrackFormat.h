@@ -1,0 +1,54 @@
+// A track format: how the samples of one track are coded.
+#pragma once
+
+#include "adm/ADMElement.h"
+#include "adm/ADMReferences.h"
+
+#include <cstdint>
+#include <memory>
+#include <optional>
+#include <string>
+#include <string_view>
+#include <utility>
+#include <vector>
+
+class ADMAudioStreamFormat;
+
+class KT_EXPORT ADMAudioTrackFormat : public ADMElement {
+public:
+    /// `audioTrackFormatWithAttributes:`
+    static std::unique_ptr<ADMAudioTrackFormat>
+    audioTrackFormatWithAttributes(const platform::XMLAttributes& attributes);
+    explicit ADMAudioTrackFormat(const platform::XMLAttributes& attributes);
+
+    const std::string& audioTrackFormatID() const { return audioTrackFormatID_; }
+    void setAudioTrackFormatID(std::string value) { audioTrackFormatID_ = std::move(value); }
+    const std::string& audioTrackFormatName() const { return audioTrackFormatName_; }
+    void setAudioTrackFormatName(std::string value) { audioTrackFormatName_ = std::move(value); }
+    const std::optional<std::string>& formatLabel() const { return formatLabel_; }
+    void setFormatLabel(std::optional<std::string> value) { formatLabel_ = std::move(value); }
+    const std::optional<std::string>& formatDefinition() const { return formatDefinition_; }
+    void setFormatDefinition(std::optional<std::string> value) { formatDefinition_ = std::move(value); }
+    const std::optional<std::string>& audioStreamFormatRefID() const { return audioStreamFormat_.id; }
+    void setAudioStreamFormatRefID(std::optional<std::string> value) { audioStreamFormat_.id = std::move(value); }
+    ADMAudioStreamFormat* audioStreamFormat() const { return audioStreamFormat_.element; }
+    void setAudioStreamFormat(ADMAudioStreamFormat* value) { audioStreamFormat_.element = value; }
+    /// Not filled from documents.
+    const std::vector<std::string>& formatIDRefs() const { return formatIDRefs_; }
+    void setFormatIDRefs(std::vector<std::string> value) { formatIDRefs_ = std::move(value); }
+
+    std::string_view elementName() const override { return "audioTrackFormat"; }
+    std::string elementID() const override { return audioTrackFormatID_; }
+    void setSubElement(std::string_view name, std::string_view value,
+                       const platform::XMLAttributes& attributes) override;
+    void addSubElement_audioStreamFormatIDRef(std::string_view value, const platform::XMLAttributes& attributes);
+    void resolveIDRefsWithResolver(ADMElementResolver& resolver) override;
+
+private:
+    std::string audioTrackFormatID_;
+    std::string audioTrackFormatName_;
+    std::optional<std::string> formatLabel_;
+    std::optional<std::string> formatDefinition_;
+    ADMReference<ADMAudioStreamFormat> audioStreamFormat_;
+    std::vector<std::string> formatIDRefs_;
+};

@@ -1,0 +1,153 @@
+#include "adm/ADMDocument.h"
+
+#include "adm/ADMIdentifier.h"
+#include "platform/Log.h"
+
+std::unique_ptr<ADMDocument> ADMDocument::initWithADMData(std::optional<Bytes> data)
+{
+    if (!data) {
+        platform::logLine("ImportADM: nil data pointer passed to ADMDocument");
+        return nullptr;
+    }
+    return std::make_unique<ADMDocument>(std::make_unique<platform::MemoryInputStream>(*std::move(data)));
+}
+
+ADMDocument::ADMDocument(std::unique_ptr<platform::InputStream> stream) : inputStream_(std::move(stream))
+{
+}
+
+ADMDocument::~ADMDocument() = default;
+
+void ADMDocument::addAudioProgramme(std::unique_ptr<ADMAudioProgramme> element)
+{
+    const std::string& id = element->audioProgrammeID();
+    audioProgrammes_.insert(id, std::move(element));
+}
+
+void ADMDocument::addAudioContent(std::unique_ptr<ADMAudioContent> element)
+{
+    const std::string& id = element->audioContentID();
+    audioContents_.insert(id, std::move(element));
+}
+
+void ADMDocument::addAudioObject(std::unique_ptr<ADMAudioObject> element)
+{
+    const std::string& id = element->audioObjectID();
+    audioObjects_.insert(id, std::move(element));
+}
+
+void ADMDocument::addAudioChannelFormat(std::unique_ptr<ADMAudioChannelFormat> element)
+{
+    const std::string& id = element->audioChannelFormatID();
+    audioChannelFormats_.insert(id, std::move(element));
+}
+
+void ADMDocument::addAudioTrackFormat(std::unique_ptr<ADMAudioTrackFormat> element)
+{
+    const std::string& id = element->audioTrackFormatID();
+    audioTrackFormats_.insert(id, std::move(element));
+}
+
+void ADMDocument::addAudioPackFormat(std::unique_ptr<ADMAudioPackFormat> element)
+{
+    const std::string& id = element->audioPackFormatID();
+    audioPackFormats_.insert(id, std::move(element));
+}
+
+void ADMDocument::addAudioStreamFormat(std::unique_ptr<ADMAudioStreamFormat> element)
+{
+    const std::string& id = element->audioStreamFormatID();
+    audioStreamFormats_.insert(id, std::move(element));
+}
+
+void ADMDocument::addAudioTrackUID(std::unique_ptr<ADMAudioTrackUID> element)
+{
+    const std::string& id = element->audioTrackUIDID();
+    audioTrackUIDs_.insert(id, std::move(element));
+}
+
+ADMElement* ADMDocument::findADMElementRef(std::optional<std::string_view> identifier,
+                                           std::optional<std::string_view> typePrefix)
+{
+    if (!identifier)
+        return nullptr;
+    if (!typePrefix)
+        typePrefix = adm::parseIdentifier(*identifier, nullptr, nullptr, nullptr);
+    if (typePrefix->empty())
+        return nullptr;
+    if (ADMElement* found = find(*identifier, *typePrefix))
+        return found;
+    throw ADMException(kADMExceptionMissingDefinition,
+                       "'" + std::string(*identifier) + "' referenced, but not defined");
+}
+
+ADMElement* ADMDocument::find(std::string_view identifier, std::string_view prefix) const
+{
+    switch (adm::packedPrefix(prefix)) {
+    case adm::packedPrefix(kADMAudioTrackUIDPrefix):
+        return audioTrackUIDs_.find(identifier);
+    case adm::packedPrefix(kADMAudioTrackFormatPrefix):
+        return audioTrackFormats_.find(identifier);
+    case adm::packedPrefix(kADMAudioStreamFormatPrefix):
+        return audioStreamFormats_.find(identifier);
+    case adm::packedPrefix(kADMAudioChannelFormatPrefix):
+        return audioChannelFormats_.find(identifier);
+    case adm::packedPrefix(kADMAudioPackFormatPrefix):
+        return audioPackFormats_.find(identifier);
+    case adm::packedPrefix(kADMAudioObjectPrefix):
+        return audioObjects_.find(identifier);
+    case adm::packedPrefix(kADMAudioContentPrefix):
+        return audioContents_.find(identifier);
+    case adm::packedPrefix(kADMAudioProgrammePrefix):
+        return audioProgrammes_.find(identifier);
+    default:
+        return nullptr;
+    }
+}
+
+/// Finds for one element after the other; knows which, so that a problem can be told with its place.
+class ADMDocument::LinkFinder : public ADMElementResolver {
+public:
+    explicit LinkFinder(ADMDocument& document) : document_(document) {}
+    void setElement(const ADMElement& element) { element_ = &element; }
+
+    ADMElement* findADMElementRef(std::optional<std::string_view> identifier,
+                                  std::optional<std::string_view> typePrefix) override
+    {
+        if (document_.options_.silentTrack && identifier == "ATU_00000000")
+            return nullptr;
+        try {
+            return document_.findADMElementRef(identifier, typePrefix);
+        } catch (const ADMException& problem) {
+            document_.report(problem, element_->elementID(), element_->documentPosition());
+            if (!document_.options_.continuePastUnresolvedReferences)
+                throw;
+            return nullptr;
+        }
+    }
+
+private:
+    ADMDocument& document_;
+    const ADMElement* element_ = nullptr;
+};
+
+template <class Table>
+void ADMDocument::resolve(const Table& table, LinkFinder& finder)
+{
+    for (ADMElement& element : table) {
+        finder.setElement(element);
+        element.resolveIDRefsWithResolver(finder);
+    }
+}
+
+void ADMDocument::resolveIDRefs()
+{
+    LinkFinder finder(*this);
+    resolve(audioProgrammes_, finder);
+    resolve(audioContents_, finder);
+    resolve(audioObjects_, finder);
+    resolve(audioTrackUIDs_, finder);
+    resolve(audioPackFormats_, finder);
+    resolve(audioStreamFormats_, finder);
+    resolve(audioTrackFormats_, finder);
+}

@@ -1,0 +1,45 @@
+// A sub-element that is no ADM element of its own: its name, its text, its attributes.
+#pragma once
+
+#include "platform/XMLParser.h"
+#include "platform/core/Export.h"
+
+#include <memory>
+#include <string>
+#include <string_view>
+#include <vector>
+
+class KT_EXPORT ADMGenericElement {
+public:
+    /// `elementWithName:attributes:`; the value is empty.
+    static std::unique_ptr<ADMGenericElement> elementWithName(std::string_view name,
+                                                              const platform::XMLAttributes& attributes);
+    ADMGenericElement(const ADMGenericElement&) = delete;
+    ADMGenericElement& operator=(const ADMGenericElement&) = delete;
+
+    const std::string& name() const { return name_; }
+    void setName(std::string name) { name_ = std::move(name); }
+    const std::string& value() const { return value_; }
+    void setValue(std::string value) { value_ = std::move(value); }
+    void appendValue(std::string_view text) { value_ += text; }
+    /// Views of what the element owns.
+    platform::XMLAttributes attributes() const { return attributes_; }
+    /// They must not be the element's own.
+    void setAttributes(const platform::XMLAttributes& attributes);
+
+    /// Where it began, if anybody wants to know; else zeros.
+    platform::XMLPosition documentPosition() const { return documentPosition_; }
+    void setDocumentPosition(platform::XMLPosition position) { documentPosition_ = position; }
+
+    /// Makes another element of it, in the memory of the first.
+    void reset(std::string_view name, const platform::XMLAttributes& attributes);
+
+private:
+    ADMGenericElement() = default;
+
+    std::string name_;
+    std::string value_;
+    std::vector<char> text_; // of the attributes, and room behind it
+    std::vector<platform::XMLAttribute> attributes_;
+    platform::XMLPosition documentPosition_;
+};

@@ -1,0 +1,58 @@
+// The identifiers of ITU-R BS.2076: a prefix, which tells the kind of element, and hexadecimal fields.
+#pragma once
+
+#include "adm/ADMTypes.h"
+#include "platform/core/Export.h"
+
+#include <cstdint>
+#include <string>
+#include <string_view>
+
+inline constexpr const char* kADMAudioProgrammePrefix = "APR";
+inline constexpr const char* kADMAudioContentPrefix = "ACO";
+inline constexpr const char* kADMAudioObjectPrefix = "AO";
+inline constexpr const char* kADMAudioPackFormatPrefix = "AP";
+inline constexpr const char* kADMAudioChannelFormatPrefix = "AC";
+inline constexpr const char* kADMAudioStreamFormatPrefix = "AS";
+inline constexpr const char* kADMAudioTrackFormatPrefix = "AT";
+inline constexpr const char* kADMAudioTrackUIDPrefix = "ATU";
+inline constexpr const char* kADMAudioBlockPrefix = "AB";
+
+/// Splits an ID; any pointer may be null, and what the prefix has no field for is left as it is.
+///
+/// | prefix | form | fields |
+/// |---|---|---|
+/// | AP, AC, AS | AP_yyyyxxxx | type, index |
+/// | AT | AT_yyyyxxxx_zz | type, index, subIndex |
+/// | AB | AB_yyyyxxxx_zzzzzzzz | type, index, subIndex |
+/// | ATU | ATU_xxxxxxxx | index |
+/// | APR, ACO, AO | AO_xxxx | index |
+/// | AVS | AVS_xxxx_zzzz | index, subIndex |
+///
+/// The prefix is given in upper case. A field is read, and so checked, when it is asked for; the eight digits of AP,
+/// AC, AS, AT and AB always. Text behind the last field is ignored. Raises MalformedIDString.
+KT_EXPORT void ADMParseIdentifier(std::string_view identifier, std::string* prefix, ADMType_t* type,
+                                  std::uint32_t* index, std::uint32_t* subIndex);
+
+/// Raises WrongIDPrefix when `prefix` is not `expected`; `element` is the element's name.
+KT_EXPORT void ADMRequirePrefix(std::string_view prefix, std::string_view expected, std::string_view element);
+
+namespace adm {
+
+inline constexpr std::size_t kLongestPrefix = 3;
+
+/// The characters of a prefix in one number, which is quick to compare; 0 for what is too long for one.
+constexpr std::uint32_t packedPrefix(std::string_view prefix)
+{
+    std::uint32_t packed = 0;
+    if (prefix.size() <= kLongestPrefix)
+        for (const char c : prefix)
+            packed = packed << 8 | static_cast<unsigned char>(c);
+    return packed;
+}
+
+/// ADMParseIdentifier, but returns the prefix, which lives for ever.
+std::string_view parseIdentifier(std::string_view identifier, ADMType_t* type, std::uint32_t* index,
+                                 std::uint32_t* subIndex);
+
+} // namespace adm

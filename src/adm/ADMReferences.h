@@ -1,0 +1,59 @@
+// References from one element to others: the IDs as they stand in the document, and the links found for them.
+#pragma once
+
+#include "adm/ADMElement.h"
+
+#include <memory>
+#include <optional>
+#include <string>
+#include <string_view>
+#include <utility>
+#include <vector>
+
+/// Any number of them, in the order of the document.
+template <class Element>
+struct ADMReferenceList {
+    std::vector<std::string> ids;
+    std::vector<Element*> elements; // null where an ID was let pass that names nothing
+
+    void resolve(ADMElementResolver& resolver, std::string_view prefix)
+    {
+        for (const std::string& id : ids)
+            elements.push_back(dynamic_cast<Element*>(resolver.findADMElementRef(id, prefix)));
+    }
+};
+
+/// At most one.
+template <class Element>
+struct ADMReference {
+    std::optional<std::string> id;
+    Element* element = nullptr;
+
+    void resolve(ADMElementResolver& resolver, std::string_view prefix)
+    {
+        element = dynamic_cast<Element*>(resolver.findADMElementRef(id, prefix));
+    }
+};
+
+namespace adm {
+
+/// "(AC_00031001, AC_00031002)": links by their IDs, as elements may link each other in circles.
+template <class Element>
+std::string linksText(const std::vector<Element*>& elements)
+{
+    std::string text = "(";
+    for (const Element* element : elements) {
+        if (text.size() > 1)
+            text += ", ";
+        text += element == nullptr ? "(null)" : element->elementID();
+    }
+    return text += ")";
+}
+
+template <class Element>
+std::string linkText(const Element* element)
+{
+    return element == nullptr ? "(null)" : element->elementID();
+}
+
+} // namespace adm

@@ -1,0 +1,110 @@
+// Streaming XML: a stream is read in pieces, and what stands in it is told to a handler, element by element. Names are
+// taken as they are written: `prefix:name` is a name of its own, `xmlns` an attribute like any other. Only the
+// predefined entities are known, nothing external is ever opened.
+#pragma once
+
+#include "platform/InputStream.h"
+#include "platform/core/Error.h"
+#include "platform/core/Export.h"
+
+#include <cstdint>
+#include <functional>
+#include <initializer_list>
+#include <memory>
+#include <optional>
+#include <span>
+#include <string_view>
+#include <vector>
+
+namespace platform {
+
+/// The domain of the errors of XML; their codes are the parser library's own.
+inline constexpr const char* kXMLErrorDomain = "xml";
+/// How many elements may be open at a time.
+inline constexpr int kXMLMaximumDepth = 256;
+
+struct XMLAttribute {
+    std::string_view name;
+    std::string_view value;
+};
+
+/// The attributes of one element, in the order in which they are written; a view, valid as long as what it looks at.
+class XMLAttributes {
+public:
+    XMLAttributes() = default;
+    XMLAttributes(const std::vector<XMLAttribute>& attributes) : attributes_(attributes) {}
+    /// For one call: `f({{"name", "value"}})`.
+    XMLAttributes(std::initializer_list<XMLAttribute> attributes) : attributes_(attributes.begin(), attributes.size())
+    {
+    }
+
+    std::optional<std::string_view> find(std::string_view name) const
+    {
+        for (const XMLAttribute& attribute : attributes_)
+            if (attribute.name == name)
+                return attribute.value;
+        return std::nullopt;
+    }
+    auto begin() const { return attributes_.begin(); }
+    auto end() const { return attributes_.end(); }
+    std::size_t size() const { return attributes_.size(); }
+
+private:
+    std::span<const XMLAttribute> attributes_;
+};
+
+/// A place in a document, both counted from 1, columns in characters; 0 where it is not known.
+struct XMLPosition {
+    std::uint32_t line = 0;
+    std::uint32_t column = 0;
+    friend bool operator==(const XMLPosition&, const XMLPosition&) = default;
+};
+
+/// What hears of a document. The texts are valid during the call. What a handler throws ends the parse and leaves it.
+class KT_EXPORT XMLHandler {
+public:
+    virtual ~XMLHandler() = default;
+    virtual void startElement(std::string_view name, const XMLAttributes& attributes) = 0;
+    virtual void endElement(std::string_view name) = 0;
+    /// Text, CDATA and white space alike; one text may come in many pieces.
+    virtual void characters(std::string_view text) = 0;
+    /// Called at the end of a well-formed document only.
+    virtual void endDocument() {}
+};
+
+/// One parse of one stream. Understood are UTF-8, UTF-16, US-ASCII and ISO-8859-1. Refused, beside what is not
+/// well-formed: declarations inside a DOCTYPE (and so every entity of a document's own), tags of more than 16 KiB, a
+/// depth of more than `kXMLMaximumDepth`, comments and CDATA sections of more than 10 MB, more than 256 namespaces that
+/// are in force at a time. Memory does not grow with the document.
+class KT_EXPORT XMLParser {
+public:
+    /// Gets the number of bytes read so far, and returns false to cancel.
+    using ProgressHandler = std::function<bool(std::uint64_t)>;
+
+    /// Stream and handler must outlive the parser.
+    XMLParser(InputStream& stream, XMLHandler& handler);
+    ~XMLParser();
+    XMLParser(const XMLParser&) = delete;
+    XMLParser& operator=(const XMLParser&) = delete;
+
+    /// Called for each piece that is read, of 64 KiB at most.
+    void setProgressHandler(ProgressHandler handler);
+
+    /// True for a well-formed document. Else false with `error`: of the domain `kXMLErrorDomain` with "line" and
+    /// "column" in its user information; or of `ErrorDomain::status`, with the stream's code or kStatusUserCancelled.
+    /// Rethrows what the handlers throw.
+    bool parse(Error* error = nullptr);
+    /// From within a handler: no further event, and `parse` returns false, cancelled.
+    void abort();
+
+    /// Where the parser is.
+    XMLPosition position() const;
+    /// Within `startElement`: where the element's tag begins.
+    XMLPosition elementPosition() const;
+
+private:
+    class Implementation;
+    std::unique_ptr<Implementation> implementation_;
+};
+
+} // namespace platform

@@ -1,0 +1,370 @@
+#include "platform/XMLParser.h"
+
+#include "platform/core/Status.h"
+#include "platform/libxml2/XMLInput.h"
+
+#include <algorithm>
+#include <array>
+#include <exception>
+#include <forward_list>
+#include <new>
+#include <string>
+#include <vector>
+
+#include <libxml/parser.h>
+#include <libxml/parserInternals.h>
+
+namespace platform {
+
+namespace {
+
+// The parser compares every attribute of a tag with every other, so that a tag for which more than this is read is
+// refused: time stays in proportion to the bytes.
+constexpr std::size_t kLongestTag = 16 * 1024;
+// It looks for a prefix among all the namespaces in force.
+constexpr int kMostNamespaces = 256;
+
+std::string_view viewOf(const xmlChar* text)
+{
+    return reinterpret_cast<const char*>(text);
+}
+
+std::string_view viewOf(const xmlChar* begin, const xmlChar* end)
+{
+    return {reinterpret_cast<const char*>(begin), static_cast<std::size_t>(end - begin)};
+}
+
+/// Line and column as an error carries them.
+void addPosition(Error& error, XMLPosition position)
+{
+    error.userInfo["line"] = position.line;
+    error.userInfo["column"] = position.column;
+}
+
+} // namespace
+
+/// libxml2 pulls the bytes, and its events go to the handler. Nothing is thrown through the C library's frames.
+class XMLParser::Implementation {
+public:
+    Implementation(InputStream& stream, XMLHandler& handler) : input_(stream), handler_(handler) {}
+
+    bool parse(Error* error);
+    void abort();
+    XMLPosition position() const;
+    XMLPosition elementPosition() const;
+    libxml2::XMLInput& input() { return input_; }
+
+private:
+    static xmlSAXHandler handlers();
+    static void onStart(void* self, const xmlChar* name, const xmlChar* prefix, const xmlChar* uri, int namespaces,
+                        const xmlChar** namespacePairs, int attributes, int defaulted, const xmlChar** attributeRows);
+    static void onEnd(void* self, const xmlChar* name, const xmlChar* prefix, const xmlChar* uri);
+    static void onCharacters(void* self, const xmlChar* text, int length);
+    static void onError(void* self, xmlErrorPtr error);
+    static int onRead(void* self, char* buffer, int length);
+    static void refuseDeclaration(void* self);
+    static xmlEntityPtr refuseEntity(void* self, const xmlChar* name);
+
+    template <class Event>
+    void handle(Event event)
+    {
+        sinceEvent_ = 0;
+        if (stopped_)
+            return;
+        try {
+            event();
+        } catch (...) {
+            thrown_ = std::current_exception();
+            stop();
+        }
+    }
+    void start(const xmlChar* name, const xmlChar* prefix, int namespaces, const xmlChar** namespacePairs,
+               int attributes, const xmlChar** attributeRows);
+    /// A name as it is written, out of the two parts into which the parser takes it; valid during the event.
+    std::string_view written(const xmlChar* prefix, const xmlChar* name)
+    {
+        if (prefix == nullptr)
+            return viewOf(name);
+        return ((keptNames_.emplace_front(viewOf(prefix)) += ':') += viewOf(name));
+    }
+    void fail(std::int64_t code, std::string_view message);
+    void stop();
+    bool isWithinTag() const;
+
+    struct FreeContext {
+        void operator()(xmlParserCtxtPtr context) const
+        {
+            if (context->myDoc != nullptr)
+                xmlFreeDoc(context->myDoc);
+            xmlFreeParserCtxt(context);
+        }
+    };
+
+    libxml2::XMLInput input_;
+    XMLHandler& handler_;
+    std::vector<XMLAttribute> attributes_;     // of the element that begins
+    std::forward_list<std::string> keptNames_; // that had to be joined
+    int depth_ = 0;
+    std::array<int, kXMLMaximumDepth + 1> namespaces_{}; // in force at each depth
+    std::size_t sinceEvent_ = 0;                         // bytes read since the last event
+    bool stopped_ = false;
+    std::optional<Error> error_;
+    std::exception_ptr thrown_;
+    std::unique_ptr<xmlParserCtxt, FreeContext> context_;
+};
+
+xmlSAXHandler XMLParser::Implementation::handlers()
+{
+    xmlSAXHandler sax{};
+    sax.initialized = XML_SAX2_MAGIC; // without it the process-wide error handlers would be called
+    sax.startElementNs = onStart;
+    sax.endElementNs = onEnd;
+    // One function for both spares the parser the look for white space.
+    sax.characters = sax.ignorableWhitespace = sax.cdataBlock = onCharacters;
+    sax.comment = [](void* self, const xmlChar*) { static_cast<Implementation*>(self)->sinceEvent_ = 0; };
+    sax.processingInstruction = [](void* self, const xmlChar*, const xmlChar*) {
+        static_cast<Implementation*>(self)->sinceEvent_ = 0;
+    };
+    sax.getEntity = sax.getParameterEntity = refuseEntity;
+    sax.entityDecl = [](void* s, const xmlChar*, int, const xmlChar*, const xmlChar*, xmlChar*) {
+        refuseDeclaration(s);
+    };
+    sax.unparsedEntityDecl = [](void* s, const xmlChar*, const xmlChar*, const xmlChar*, const xmlChar*) {
+        refuseDeclaration(s);
+    };
+    sax.notationDecl = [](void* s, const xmlChar*, const xmlChar*, const xmlChar*) { refuseDeclaration(s); };
+    sax.elementDecl = [](void* s, const xmlChar*, int, xmlElementContentPtr) { refuseDeclaration(s); };
+    sax.attributeDecl = [](void* s, const xmlChar*, const xmlChar*, int, int, const xmlChar*,
+                           xmlEnumerationPtr values) {
+        xmlFreeEnumeration(values); // the handler owns it
+        refuseDeclaration(s);
+    };
+    sax.serror = onError;
+    return sax;
+}
+
+void XMLParser::Implementation::onStart(void* self, const xmlChar* name, const xmlChar* prefix, const xmlChar*,
+                                        int namespaces, const xmlChar** namespacePairs, int attributes, int,
+                                        const xmlChar** attributeRows)
+{
+    auto& parser = *static_cast<Implementation*>(self);
+    parser.handle([&] { parser.start(name, prefix, namespaces, namespacePairs, attributes, attributeRows); });
+}
+
+void XMLParser::Implementation::start(const xmlChar* name, const xmlChar* prefix, int namespaces,
+                                      const xmlChar** namespacePairs, int attributes, const xmlChar** attributeRows)
+{
+    // A tag that is cut off by the end of the document, or by what no tag may hold, is told before its error.
+    const xmlChar* behind = context_->input->cur;
+    if (behind[0] != '>' && !(behind[0] == '/' && behind[1] == '>'))
+        return;
+    if (depth_ == kXMLMaximumDepth)
+        return fail(XML_ERR_INTERNAL_ERROR, "elements are nested too deeply");
+    ++depth_;
+    const auto depth = static_cast<std::size_t>(depth_);
+    namespaces_[depth] = namespaces_[depth - 1] + namespaces;
+    if (namespaces_[depth] > kMostNamespaces)
+        return fail(XML_ERR_INTERNAL_ERROR, "too many namespaces are in force");
+
+    attributes_.clear();
+    keptNames_.clear();
+    for (const xmlChar** row = attributeRows; row != attributeRows + 5 * attributes; row += 5)
+        attributes_.push_back({written(row[1], row[0]), viewOf(row[3], row[4])});
+    for (const xmlChar** pair = namespacePairs; pair != namespacePairs + 2 * namespaces; pair += 2) {
+        const auto* xmlns = reinterpret_cast<const xmlChar*>("xmlns");
+        attributes_.push_back({pair[0] == nullptr ? viewOf(xmlns) : written(xmlns, pair[0]),
+                               pair[1] == nullptr ? std::string_view() : viewOf(pair[1])});
+    }
+    handler_.startElement(written(prefix, name), attributes_);
+}
+
+void XMLParser::Implementation::onEnd(void* self, const xmlChar* name, const xmlChar* prefix, const xmlChar*)
+{
+    auto& parser = *static_cast<Implementation*>(self);
+    parser.handle([&] {
+        --parser.depth_;
+        parser.keptNames_.clear();
+        parser.handler_.endElement(parser.written(prefix, name));
+    });
+}
+
+void XMLParser::Implementation::onCharacters(void* self, const xmlChar* text, int length)
+{
+    auto& parser = *static_cast<Implementation*>(self);
+    parser.handle([&] { parser.handler_.characters(viewOf(text, text + length)); });
+}
+
+void XMLParser::Implementation::onError(void* self, xmlErrorPtr error)
+{
+    // What is not fatal leaves the document well-formed; names are taken as they are written, whatever namespaces say.
+    if (error->level != XML_ERR_FATAL || error->domain == XML_FROM_NAMESPACE)
+        return;
+    auto& parser = *static_cast<Implementation*>(self);
+    parser.handle([&] {
+        std::string_view message = error->message == nullptr ? "" : error->message;
+        while (message.ends_with('\n'))
+            message.remove_suffix(1);
+        // The message quotes the document, which may have names of any length.
+        parser.fail(error->code, message.empty() || message.size() > 200 ? "it is not well-formed" : message);
+    });
+}
+
+void XMLParser::Implementation::refuseDeclaration(void* self)
+{
+    auto& parser = *static_cast<Implementation*>(self);
+    parser.handle([&] { parser.fail(XML_ERR_INTERNAL_ERROR, "a declaration inside the DOCTYPE"); });
+}
+
+/// Called for what is none of the predefined entities.
+xmlEntityPtr XMLParser::Implementation::refuseEntity(void* self, const xmlChar*)
+{
+    auto& parser = *static_cast<Implementation*>(self);
+    parser.handle([&] { parser.fail(XML_ERR_UNDECLARED_ENTITY, "an entity that is not predefined"); });
+    return nullptr;
+}
+
+int XMLParser::Implementation::onRead(void* self, char* buffer, int length)
+{
+    auto& parser = *static_cast<Implementation*>(self);
+    if (parser.sinceEvent_ > kLongestTag && parser.isWithinTag())
+        parser.handle([&] { parser.fail(XML_ERR_ATTRIBUTE_NOT_FINISHED, "a tag is too long"); });
+    // The document ends here for the parser, which may not be stopped by force while it holds pointers into its buffer.
+    if (parser.stopped_)
+        return 0;
+    std::string_view text;
+    const std::size_t sinceEvent = parser.sinceEvent_;
+    parser.handle([&] { text = parser.input_.next(static_cast<std::size_t>(length)); });
+    std::copy(text.begin(), text.end(), buffer);
+    parser.sinceEvent_ = parser.isWithinTag() ? sinceEvent + text.size() : 0;
+    return static_cast<int>(text.size());
+}
+
+/// Whether what is being parsed is a tag, when there was no event for long: text comes in small pieces, while comments,
+/// CDATA sections and the DOCTYPE, which come whole, have states of their own.
+bool XMLParser::Implementation::isWithinTag() const
+{
+    return context_ != nullptr &&
+           (context_->instate == XML_PARSER_CONTENT || context_->instate == XML_PARSER_ATTRIBUTE_VALUE);
+}
+
+void XMLParser::Implementation::fail(std::int64_t code, std::string_view message)
+{
+    if (!error_) {
+        platform::fail(&error_.emplace(), kXMLErrorDomain, code, std::string(message));
+        addPosition(*error_, position());
+    }
+    stop();
+}
+
+void XMLParser::Implementation::stop()
+{
+    stopped_ = true;
+    if (context_ != nullptr)
+        context_->disableSAX = 1;
+}
+
+void XMLParser::Implementation::abort()
+{
+    if (!error_)
+        platform::fail(&error_.emplace(), ErrorDomain::status, kStatusUserCancelled, StatusText(kStatusUserCancelled));
+    stop();
+}
+
+bool XMLParser::Implementation::parse(Error* error)
+{
+    xmlInitParser();
+    xmlSAXHandler sax = handlers();
+    context_.reset(xmlCreateIOParserCtxt(&sax, this, onRead, nullptr, this, XML_CHAR_ENCODING_NONE));
+    if (context_ == nullptr)
+        throw std::bad_alloc();
+    // Pulled, not pushed: the push parser is quadratic on long CDATA sections. XML_PARSE_NOENT is for the predefined
+    // entities, the only ones that there are: without it "&amp;" in an attribute would be handed over as "&#38;".
+    xmlCtxtUseOptions(context_.get(), XML_PARSE_NONET | XML_PARSE_IGNORE_ENC | XML_PARSE_NOENT);
+    xmlParseDocument(context_.get());
+    // What ended the input is the cause; that the document is cut off then follows.
+    if (input_.failed() && !thrown_) {
+        Error cause = input_.error();
+        if (cause.domain == kXMLErrorDomain)
+            addPosition(cause, position());
+        error_ = std::move(cause);
+    } else if (context_->wellFormed == 0) {
+        handle([&] { fail(XML_ERR_DOCUMENT_EMPTY, "it is not well-formed"); });
+    }
+    if (thrown_)
+        std::rethrow_exception(thrown_);
+    if (error_) {
+        if (error != nullptr)
+            *error = *error_;
+        return false;
+    }
+    handler_.endDocument();
+    return true;
+}
+
+XMLPosition XMLParser::Implementation::position() const
+{
+    if (context_ == nullptr || context_->input == nullptr)
+        return {};
+    return {static_cast<std::uint32_t>(context_->input->line), static_cast<std::uint32_t>(context_->input->col)};
+}
+
+XMLPosition XMLParser::Implementation::elementPosition() const
+{
+    XMLPosition found = position();
+    if (found.line == 0)
+        return found;
+    // The parser stands behind the attributes, none of which may hold a '<'.
+    const std::string_view behind = viewOf(context_->input->base, context_->input->cur);
+    const std::size_t begin = behind.rfind('<');
+    if (begin == behind.npos)
+        return found;
+    const std::string_view tag = behind.substr(begin);
+    const auto breaks = static_cast<std::uint32_t>(std::count(tag.begin(), tag.end(), '\n'));
+    const auto characters = [](std::string_view text) {
+        return static_cast<std::uint32_t>(
+            std::count_if(text.begin(), text.end(), [](char c) { return (c & 0xC0) != 0x80; }));
+    };
+    found.line -= breaks;
+    if (breaks == 0) {
+        found.column -= std::min(characters(tag), found.column - 1);
+    } else {
+        // The start of a very long line may have left the parser's buffer.
+        const std::size_t lineBreak = behind.rfind('\n', begin);
+        found.column = characters(behind.substr(0, begin).substr(lineBreak == behind.npos ? 0 : lineBreak + 1)) + 1;
+    }
+    return found;
+}
+
+XMLParser::XMLParser(InputStream& stream, XMLHandler& handler)
+    : implementation_(std::make_unique<Implementation>(stream, handler))
+{
+}
+
+XMLParser::~XMLParser() = default;
+
+void XMLParser::setProgressHandler(ProgressHandler handler)
+{
+    implementation_->input().setProgressHandler(std::move(handler));
+}
+
+bool XMLParser::parse(Error* error)
+{
+    return implementation_->parse(error);
+}
+
+void XMLParser::abort()
+{
+    implementation_->abort();
+}
+
+XMLPosition XMLParser::position() const
+{
+    return implementation_->position();
+}
+
+XMLPosition XMLParser::elementPosition() const
+{
+    return implementation_->elementPosition();
+}
+
+} // namespace platform

@@ -1,0 +1,176 @@
+#include "platform/XMLParser.h"
+#include "platform/XMLNode.h"
+#include "platform/core/Status.h"
+
+#include <gtest/gtest.h>
+
+#include <stdexcept>
+
+using namespace platform;
+
+namespace {
+
+Bytes bytesFrom(std::string_view text)
+{
+    const BytesView bytes = bytesOf(text);
+    return Bytes(bytes.begin(), bytes.end());
+}
+
+/// Gives one byte at a time, and at the end a status.
+class SlowStream : public InputStream {
+public:
+    SlowStream(std::string_view text, std::ptrdiff_t end) : text_(text), end_(end) {}
+    std::ptrdiff_t read(std::span<std::byte> buffer) override
+    {
+        if (text_.empty())
+            return end_;
+        buffer[0] = static_cast<std::byte>(text_[0]);
+        text_.remove_prefix(1);
+        return 1;
+    }
+
+private:
+    std::string_view text_;
+    std::ptrdiff_t end_;
+};
+
+/// Writes what it hears down again.
+class Writer final : public XMLHandler {
+public:
+    void startElement(std::string_view name, const XMLAttributes& attributes) override
+    {
+        (out += '<') += name;
+        for (const XMLAttribute& each : attributes)
+            ((((out += ' ') += each.name) += "='") += each.value) += "'";
+        out += '>';
+        if (name == "throw")
+            throw std::runtime_error("thrown");
+        if (name == "abort")
+            parser->abort();
+    }
+    void endElement(std::string_view name) override { ((out += "</") += name) += '>'; }
+    void characters(std::string_view text) override { out += text; }
+    void endDocument() override { out += "."; }
+
+    std::string out;
+    XMLParser* parser = nullptr;
+};
+
+/// What was heard; behind it " ! " and the error.
+std::string heard(InputStream& stream)
+{
+    Writer writer;
+    XMLParser parser(stream, writer);
+    writer.parser = &parser;
+    Error error;
+    if (!parser.parse(&error))
+        writer.out += " ! " + error.description;
+    return writer.out;
+}
+
+TEST(XMLParser, NamesAndTextsAsTheyAreWritten)
+{
+    const struct {
+        std::string_view text;
+        const char* heard;
+    } rows[] = {
+        {"<a x='1' y=\"&lt;&#x41;&quot;\"/>", "<a x='1' y='<A\"'></a>."},
+        {"<p:a p:x='1' xmlns:q='u' xmlns='d'><q:b/></p:a>", "<p:a p:x='1' xmlns:q='u' xmlns='d'><q:b></q:b></p:a>."},
+        {"<a:b:c/>", "<a:b:c></a:b:c>."},
+        {"<a>1 <![CDATA[<&]]>\r\n<!-- c --> &amp;</a>\n", "<a>1 <&\n &</a>."},
+        {"<!DOCTYPE a SYSTEM 'file:///nowhere'><a/>", "<a></a>."},
+        {"\xEF\xBB\xBF<a>\xC3\xA9</a>", "<a>\xC3\xA9</a>."},
+        {"<?xml version='1.0' encoding='iso-8859-1'?><a>\xE9</a>", "<a>\xC3\xA9</a>."},
+        {{"\xFE\xFF\0<\0a\0>\x20\xAC\xD8\x34\xDD\x1E\0<\0/\0a\0>", 22}, "<a>\xE2\x82\xAC\xF0\x9D\x84\x9E</a>."},
+        {{"<\0a\0/\0>\0", 8}, "<a></a>."},
+    };
+    for (const auto& row : rows) {
+        SlowStream slow(row.text, 0);
+        EXPECT_EQ(heard(slow), row.heard);
+        MemoryInputStream fast(bytesFrom(row.text));
+        EXPECT_EQ(heard(fast), row.heard);
+    }
+}
+
+TEST(XMLParser, WhatIsRefused)
+{
+    const std::string manyNamespaces = [] {
+        std::string text = "<a";
+        for (int i = 0; i < 257; ++i)
+            text += " xmlns:n" + std::to_string(i) + "='u'";
+        return text + "/>";
+    }();
+    std::string deep;
+    for (int i = 0; i < 100000; ++i)
+        deep += "<a>";
+    const struct {
+        std::string text;
+        const char* error;
+    } rows[] = {
+        {"", "Document is empty"},
+        {"text", "the document does not begin with '<'"},
+        {"<a>&custom;</a>", "an entity that is not predefined"},
+        {"<!DOCTYPE a SYSTEM 'x'><a>&custom;</a>", "an entity that is not predefined"},
+        {"<!DOCTYPE a [<!ENTITY x 'y'>]><a/>", "a declaration inside the DOCTYPE"},
+        {"<!DOCTYPE a [<!ENTITY % x SYSTEM 'file:///etc/hostname'> %x;]><a/>", "a declaration inside the DOCTYPE"},
+        {"<!DOCTYPE a [<!ATTLIST a b (c|d) 'c'>]><a/>", "a declaration inside the DOCTYPE"},
+        {"<a x='1' x='2'/>", "Attribute x redefined"},
+        {"<a>\xFF</a>", "Input is not proper UTF-8, indicate encoding !\nBytes: 0xFF 0x3C 0x2F 0x61"},
+        {std::string("<a>\0</a>", 8), "a NUL character"},
+        {"<?xml version='1.0' encoding='EBCDIC-US'?><a/>", "the encoding 'EBCDIC-US' is not supported"},
+        {std::string("\xFF\xFE<\0\x34\xD8<\0", 8), "a surrogate stands alone"},
+        {std::string("\xFF\xFE<\0a", 5), "the document ends within a character"},
+        {"<a b='" + std::string(10'000'000, 'x') + "'/>", "a tag is too long"},
+        {manyNamespaces, "too many namespaces are in force"},
+        {deep, "elements are nested too deeply"},
+        {"<a/><b/>", "Extra content at the end of the document"},
+    };
+    for (const auto& row : rows) {
+        MemoryInputStream stream(bytesFrom(row.text));
+        const std::string said = heard(stream);
+        EXPECT_EQ(said.substr(std::min(said.find(" ! ") + 3, said.size())), row.error);
+        EXPECT_EQ(said.find("</a>."), std::string::npos);
+    }
+}
+
+TEST(XMLParser, LongTextIsNoLongTag)
+{
+    const std::string text(3'000'000, 'x');
+    for (const std::string& document : {"<a>" + text + "</a>", "<a><![CDATA[" + text + "]]></a>"}) {
+        MemoryInputStream stream(bytesFrom(document));
+        EXPECT_EQ(heard(stream), "<a>" + text + "</a>.");
+    }
+    MemoryInputStream comment(bytesFrom("<a><!--" + text + "--></a>"));
+    EXPECT_EQ(heard(comment), "<a></a>.");
+}
+
+TEST(XMLParser, EndsBeforeTheDocumentDoes)
+{
+    SlowStream broken("<a><b>", kStatusIOError);
+    EXPECT_EQ(heard(broken), std::string("<a><b> ! cannot read: ") + StatusText(kStatusIOError));
+    MemoryInputStream aborted(bytesFrom("<a><abort/><b/></a>"));
+    EXPECT_EQ(heard(aborted), std::string("<a><abort> ! ") + StatusText(kStatusUserCancelled));
+    MemoryInputStream thrown(bytesFrom("<a><throw/><b/></a>"));
+    EXPECT_THROW(heard(thrown), std::runtime_error);
+}
+
+TEST(XMLNode, LooksAroundInATree)
+{
+    MemoryInputStream stream(bytesFrom("<a x='&lt;' p:y='2'><b>1<c>2</c></b><d/><b>3</b></a>"));
+    const auto tree = XMLTree::parse(stream);
+    ASSERT_NE(tree, nullptr);
+    const XMLNode root = tree->root();
+    EXPECT_EQ(root.name(), "a");
+    EXPECT_EQ(root.attribute("x"), "<");
+    EXPECT_EQ(root.attribute("p:y"), "2");
+    EXPECT_EQ(root.attribute("y"), std::nullopt);
+    ASSERT_EQ(root.elementsForName("b").size(), 2U);
+    EXPECT_EQ(root.elementsForName("b")[0].stringValue(), "12");
+    EXPECT_EQ(root.stringValue(), "123");
+    Error error;
+    MemoryInputStream cut(bytesFrom("<a><b>"));
+    EXPECT_EQ(XMLTree::parse(cut, &error), nullptr);
+    EXPECT_EQ(error.domain, kXMLErrorDomain);
+}
+
+} // namespace

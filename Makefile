@@ -3,7 +3,7 @@ JOBS ?= $(shell nproc)
 PREFIX ?= /usr/local
 FUZZ_SECONDS ?= 60
 
-.PHONY: all run test asan tsan bench fuzz install package clean
+.PHONY: all run test asan tsan stress bench fuzz install package clean
 
 all:
 	@scripts/setup build
@@ -24,6 +24,13 @@ asan tsan:
 	@cmake --preset $@ $(CMAKE_FLAGS) >/dev/null
 	cmake --build --preset $@ -j $(JOBS)
 	ctest --preset $@
+
+# 1,000 targeted and 5,000 random kills of processes that hold, wait, ask and present.
+stress:
+	@scripts/setup build test
+	@cmake --preset test $(CMAKE_FLAGS) >/dev/null
+	cmake --build --preset test -j $(JOBS) --target test_coordination
+	KTFILES_KILLS=5000 build/test/tests/test_coordination --gtest_filter='KillTest.*'
 
 bench:
 	@scripts/setup build bench

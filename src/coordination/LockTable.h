@@ -1,0 +1,104 @@
+// The process-wide table of a lock class, from a file's key to the lock that all its users share.
+#pragma once
+
+#include "platform/FileCoordination.h"
+
+#include <map>
+#include <memory>
+#include <mutex>
+#include <vector>
+
+template <class Lock>
+class LockTable {
+public:
+    std::shared_ptr<Lock> find(const platform::CoordinatedItem& item)
+    {
+        const std::lock_guard guard(mutex_);
+        const auto found = entries_.find(item.key());
+        return !item.isValid() || found == entries_.end() ? nullptr : found->second.lock;
+    }
+
+    /// The registered lock, or the one that `make` gives, registered; null, and nothing registered, when that is null.
+    template <class Make>
+    std::shared_ptr<Lock> findOrAdd(const platform::CoordinatedItem& item, const Make& make)
+    {
+        const std::lock_guard guard(mutex_);
+        const Entry* entry = entryFor(item, make);
+        return entry != nullptr ? entry->lock : nullptr;
+    }
+
+    /// The same, and `use` of the lock, during which it cannot be removed.
+    template <class Make, class Use>
+    void findOrAddAndUse(const platform::CoordinatedItem& item, const Make& make, const Use& use)
+    {
+        std::shared_ptr<Lock> lock;
+        {
+            const std::lock_guard guard(mutex_);
+            Entry* entry = entryFor(item, make);
+            if (entry == nullptr)
+                return;
+            ++entry->users;
+            lock = entry->lock;
+        }
+        use(*lock);
+        const std::lock_guard guard(mutex_);
+        --entries_.find(item.key())->second.users;
+    }
+
+    /// Takes the file's lock out, unless it is in use: the lock that is registered no more, or null.
+    std::shared_ptr<Lock> removeUnused(const platform::CoordinatedItem& item)
+    {
+        const std::lock_guard guard(mutex_);
+        const auto found = entries_.find(item.key());
+        if (!item.isValid() || found == entries_.end() || !found->second.isUnused())
+            return nullptr;
+        std::shared_ptr<Lock> removed = std::move(found->second.lock);
+        entries_.erase(found);
+        return removed;
+    }
+
+    std::vector<std::shared_ptr<Lock>> removeAllUnused()
+    {
+        std::vector<std::shared_ptr<Lock>> removed;
+        const std::lock_guard guard(mutex_);
+        std::erase_if(entries_, [&](auto& entry) {
+            const bool isUnused = entry.second.isUnused();
+            if (isUnused)
+                removed.push_back(std::move(entry.second.lock));
+            return isUnused;
+        });
+        return removed;
+    }
+
+    std::vector<std::shared_ptr<Lock>> all()
+    {
+        std::vector<std::shared_ptr<Lock>> locks;
+        const std::lock_guard guard(mutex_);
+        for (const auto& [key, entry] : entries_)
+            locks.push_back(entry.lock);
+        return locks;
+    }
+
+private:
+    struct Entry {
+        std::shared_ptr<Lock> lock;
+        int users = 0;
+
+        bool isUnused() const { return users == 0 && !lock->isInUse(); }
+    };
+
+    template <class Make>
+    Entry* entryFor(const platform::CoordinatedItem& item, const Make& make)
+    {
+        if (!item.isValid())
+            return nullptr;
+        const auto found = entries_.find(item.key());
+        if (found != entries_.end())
+            return &found->second;
+        std::shared_ptr<Lock> made = make();
+        return made ? &entries_.emplace(item.key(), Entry{std::move(made), 0}).first->second : nullptr;
+    }
+
+    std::mutex mutex_;
+    std::map<platform::SHA256Digest, Entry> entries_;
+};

@@ -1,0 +1,19 @@
+// SHA-256, and the digest of a path by which processes agree on a file.
+#pragma once
+
+#include "platform/String.h"
+#include "platform/core/Bytes.h"
+
+#include <array>
+
+namespace platform {
+
+using SHA256Digest = std::array<std::byte, 32>;
+
+KT_EXPORT SHA256Digest sha256(BytesView bytes);
+
+/// The digest of the path's file-system representation, taken as it is (`fileSystemRepresentationSHA256`); null when
+/// the string is null or holds a NUL, which no path does.
+KT_EXPORT std::optional<SHA256Digest> fileSystemRepresentationSHA256(const String& path);
+
+} // namespace platform

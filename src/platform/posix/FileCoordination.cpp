@@ -1,0 +1,155 @@
+#include "platform/FileCoordination.h"
+
+#include "platform/FileSystem.h"
+#include "platform/core/Status.h"
+#include "platform/posix/AbsolutePath.h"
+#include "platform/posix/ItemAccess.h"
+#include "platform/posix/PresenterRegistry.h"
+
+#include <cerrno>
+#include <memory>
+#include <system_error>
+
+namespace platform {
+
+namespace {
+
+bool failOf(const std::system_error& failure, Error* error)
+{
+    return fail(error, ErrorDomain::system, failure.code().value(), failure.what());
+}
+
+bool failOfInvalidItem(Error* error)
+{
+    return fail(error, ErrorDomain::status, kStatusBadReference, "file coordination: a URL without a path");
+}
+
+struct OpenAccess final : CoordinatedAccess {
+    OpenAccess(const CoordinatedItem& coordinated, std::shared_ptr<CoordinationDirectory> directory,
+               const FilePresenter* own)
+        : CoordinatedAccess(coordinated.url()),
+          item(std::move(directory), coordinated.key(), own)
+    {
+    }
+
+    ItemAccess item;
+};
+
+} // namespace
+
+CoordinatedItem::CoordinatedItem(URLRef url) : url_(std::move(url))
+{
+    if (!url_ || absolutePath(*url_).empty())
+        return;
+    const auto key =
+        fileSystemRepresentationSHA256(resolvingSymbolicLinksInPath(String::fromUTF8(absolutePath(*url_))));
+    isValid_ = key.has_value();
+    if (key)
+        key_ = *key;
+}
+
+FilePresenter::~FilePresenter()
+{
+    FileCoordinator::removeFilePresenter(*this);
+}
+
+CoordinatedAccess::~CoordinatedAccess() = default;
+
+bool FileCoordinator::coordinateReading(const CoordinatedItem& item, ReadingOptions, const Accessor& accessor,
+                                        Error* error) const
+{
+    return coordinate(item, Kind::reading, accessor, error);
+}
+
+bool FileCoordinator::coordinateWriting(const CoordinatedItem& item, WritingOptions, const Accessor& accessor,
+                                        Error* error) const
+{
+    return coordinate(item, Kind::writing, accessor, error); // replacing asks the same of everybody
+}
+
+bool FileCoordinator::coordinateAcquiring(const CoordinatedItem& item, const Accessor& accessor, Error* error) const
+{
+    return coordinate(item, Kind::acquiring, accessor, error);
+}
+
+std::unique_ptr<CoordinatedAccess> FileCoordinator::openForReading(const CoordinatedItem& item, ReadingOptions,
+                                                                   Error* error) const
+{
+    return open(item, Kind::reading, error);
+}
+
+std::unique_ptr<CoordinatedAccess> FileCoordinator::openForWriting(const CoordinatedItem& item, WritingOptions,
+                                                                   Error* error) const
+{
+    return open(item, Kind::writing, error);
+}
+
+bool FileCoordinator::coordinate(const CoordinatedItem& item, Kind kind, const Accessor& accessor, Error* error) const
+{
+    const std::unique_ptr<CoordinatedAccess> access = open(item, kind, error);
+    if (access)
+        accessor(access->url());
+    return access != nullptr;
+}
+
+std::unique_ptr<CoordinatedAccess> FileCoordinator::open(const CoordinatedItem& item, Kind kind, Error* error) const
+{
+    if (!item.isValid()) {
+        failOfInvalidItem(error);
+        return nullptr;
+    }
+    for (;;) {
+        std::shared_ptr<CoordinationDirectory> directory;
+        try {
+            directory = CoordinationDirectory::current();
+            auto access = std::make_unique<OpenAccess>(item, directory, presenter_.get());
+            if (kind == Kind::reading)
+                access->item.acquireForReading();
+            else
+                access->item.acquireForWriting(kind == Kind::writing);
+            if (access->item.isSeen())
+                return access;
+            PresenterRegistry::shared().followFolder(); // or nobody there would ask the presenter that acquires this
+        } catch (const std::system_error& failure) {
+            if (!directory || directory->isCurrent()) {
+                failOf(failure, error);
+                return nullptr;
+            }
+        }
+    }
+}
+
+bool FileCoordinator::addFilePresenter(const std::shared_ptr<FilePresenter>& presenter, AskedBy askedBy, Error* error)
+{
+    const CoordinatedItem item(presenter->presentedItemURL());
+    if (!item.isValid())
+        return failOfInvalidItem(error);
+    try {
+        PresenterRegistry::shared().add(presenter, item.key(), askedBy);
+        return true;
+    } catch (const std::system_error& failure) {
+        return failOf(failure, error);
+    }
+}
+
+void FileCoordinator::removeFilePresenter(const FilePresenter& presenter)
+{
+    PresenterRegistry::shared().remove(presenter);
+}
+
+bool FileCoordinator::setAskedBy(const FilePresenter& presenter, AskedBy askedBy, Error* error)
+{
+    try {
+        PresenterRegistry::shared().setAskedBy(presenter, askedBy);
+        return true;
+    } catch (const std::system_error& failure) {
+        return failOf(failure, error);
+    }
+}
+
+void FileCoordinator::setCoordinationFolder(const std::string& path)
+{
+    CoordinationDirectory::setPath(path);
+}
+
+} // namespace platform

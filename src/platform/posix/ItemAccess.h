@@ -1,0 +1,64 @@
+// One coordinated access to one item, from asking for it to giving it back.
+#pragma once
+
+#include "platform/posix/CoordinationDirectory.h"
+#include "platform/posix/ItemWindow.h"
+#include "platform/posix/RequestChannel.h"
+
+#include <initializer_list>
+#include <memory>
+
+namespace platform {
+
+class FilePresenter;
+
+/// All locks lie on one open file description of its own. Whatever goes wrong, dropping that gives them back.
+class ItemAccess {
+public:
+    /// `own` is the asking coordinator's presenter, or null.
+    ItemAccess(std::shared_ptr<CoordinationDirectory> directory, const SHA256Digest& key, const FilePresenter* own);
+    ~ItemAccess();
+    ItemAccess(const ItemAccess&) = delete;
+    ItemAccess& operator=(const ItemAccess&) = delete;
+
+    /// These wait until access is had, and throw std::system_error when the system refuses. `mayGoFirst`: not to wait
+    /// for the queue while `own` owes an answer to the writer that keeps it.
+    void acquireForReading();
+    void acquireForWriting(bool mayGoFirst);
+    /// False when what was acquired is worth nothing, because the folder was deleted meanwhile.
+    bool isSeen() { return directory_->stillThere(stripe_); }
+
+private:
+    bool tryWholeWrite();
+    void acquireInQueue();
+    void askInQueue();
+    void acquireAskingUnderData(LockKind kind, bool isWriter);
+    void takeData(LockKind kind);
+    bool someoneWaits();
+    std::int64_t nextTicket(std::int64_t tickets);
+    void takeTicket(std::int64_t tickets);
+    void dropTicket(std::int64_t tickets);
+    void awaitTickets(std::initializer_list<std::int64_t> ranges);
+    std::optional<ByteRange> lowestWriterAhead();
+    std::vector<int> ask(Questions& questions, const std::vector<int>& slots, bool isWriter, bool holdsQueue);
+    std::vector<int> presentSlots(bool isWriter);
+    void findPresent(std::int64_t first, int from, int to, std::vector<int>& present);
+    void awaitAbsence(const std::vector<int>& slots, bool ofWriters);
+    int ownSlot(bool isWriter) const;
+    bool someoneIsThere(std::int64_t from, std::int64_t to, bool isWriter);
+
+    bool lockNow(std::int64_t offset, LockKind kind) { return tryLock(number(), window_.range(offset), kind); }
+    void unlockByte(std::int64_t offset) { unlock(number(), window_.range(offset)); }
+    int number() const { return stripe_.get(); }
+
+    std::shared_ptr<CoordinationDirectory> directory_;
+    SHA256Digest key_;
+    ItemWindow window_;
+    const FilePresenter* own_;
+    std::vector<int> agreed_;            // slots
+    std::optional<std::int64_t> ticket_; // kTicketCount: behind all that have one
+    Descriptor stripe_;
+    bool isAcquired_ = false;
+};
+
+} // namespace platform

@@ -1,0 +1,55 @@
+// Which bytes of which stripe file stand for an item, and what each of them means.
+#pragma once
+
+#include "platform/SecureHash.h"
+#include "platform/posix/RangeLock.h"
+
+#include <cstdint>
+
+namespace platform {
+
+inline constexpr int kStripeCount = 256;
+/// Processes that can present at a time.
+inline constexpr int kSlotCount = 1 << 16;
+inline constexpr std::int64_t kTicketCount = 1 << 22;
+
+/// Offsets in a window, lowest first. What a writer looks for (whoever presents to writers, whoever waits) lies
+/// together, and so does what a reader looks for, so that one query answers each.
+enum WindowOffset : std::int64_t {
+    kDataByte = 0,              // exclusive: a writer has access; shared: readers have
+    kQueueByte = 1,             // exclusive: a writer has its turn, and access or asks for it
+    kAskingByte = 2,            // exclusive: that writer asks presenters, and readers need not wait for those behind it
+    kParkedByte = 3,            // shared: waits for presenters, and holds nothing else; for listings only
+    kWriterPresence = 0x100000, // exclusive, one per slot: that process must be asked by writers
+    kWriterTickets = 0x110000,  // exclusive, one each: a writer waits; numbered in one sequence with …
+    kReaderTickets = 0x510000,  // … these: waits for the data byte alone
+    kReaderPresence = 0x910000, // exclusive, one per slot: that process must be asked by readers
+    kWindowSize = 0x1000000,
+};
+static_assert(kWriterPresence + kSlotCount == kWriterTickets && kWriterTickets + kTicketCount == kReaderTickets);
+static_assert(kReaderTickets + kTicketCount == kReaderPresence && kReaderPresence + kSlotCount < kWindowSize);
+
+/// Eight bits of the key choose the stripe and 38 the window in it. Items that share all 46 would merely wait for each
+/// other.
+struct ItemWindow {
+    int stripe;
+    std::int64_t base;
+
+    explicit ItemWindow(const SHA256Digest& key) : stripe(std::to_integer<int>(key[0])), base(0)
+    {
+        for (int i = 1; i <= 5; ++i)
+            base = base << 8 | std::to_integer<std::int64_t>(key[static_cast<std::size_t>(i)]);
+        base = (base >> 2) * kWindowSize;
+    }
+
+    ByteRange range(std::int64_t offset, std::int64_t length = 1) const { return {base + offset, length}; }
+    ByteRange whole() const { return range(0, kWindowSize); }
+    ByteRange presence(bool ofWriters) const
+    {
+        return range(ofWriters ? kWriterPresence : kReaderPresence, kSlotCount);
+    }
+    /// What stands at an absolute offset of the stripe, counted from the window's start.
+    std::int64_t offsetOf(std::int64_t position) const { return position - base; }
+};
+
+} // namespace platform

@@ -1,0 +1,25 @@
+// A test with a coordination folder of its own, shared with the agents that it starts.
+#pragma once
+
+#include "platform/FileCoordination.h"
+#include "support/TemporaryFolder.h"
+
+#include <gtest/gtest.h>
+
+class CoordinationFolder : public ::testing::Test {
+protected:
+    CoordinationFolder() { platform::FileCoordinator::setCoordinationFolder(folder()); }
+    ~CoordinationFolder() override { platform::FileCoordinator::setCoordinationFolder({}); }
+
+    std::string folder() const { return temporary_ / "coordination"; }
+    std::string item(const std::string& name = "song.wav") const { return temporary_ / name; }
+    static platform::URLRef urlOf(const std::string& path)
+    {
+        return platform::URL::createWithFileSystemPath(platform::String::fromUTF8(path), platform::PathStyle::posix,
+                                                       false);
+    }
+    platform::URLRef itemURL() const { return urlOf(item()); }
+
+private:
+    TemporaryFolder temporary_;
+};

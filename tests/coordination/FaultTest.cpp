@@ -1,0 +1,413 @@
+// Faults around the service: presenters that misbehave, stopped and forked processes, a bad folder, a system that
+// refuses.
+#include "AgentProcess.h"
+#include "CoordinationFolder.h"
+
+#include "coordination/KTFileCoordinationLock.h"
+#include "coordination/KTFilePresenterLock.h"
+#include "platform/core/Status.h"
+#include "platform/posix/CoordinationDirectory.h"
+#include "platform/posix/ItemWindow.h"
+
+#include <gtest/gtest.h>
+
+#include <atomic>
+#include <cerrno>
+#include <condition_variable>
+#include <fstream>
+#include <future>
+#include <thread>
+
+#include <dlfcn.h>
+#include <fcntl.h>
+#include <signal.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+namespace fs = std::filesystem;
+using namespace platform;
+
+namespace {
+
+class FaultTest : public CoordinationFolder {
+protected:
+    /// The system error with which a write fails, 0 when it does not.
+    int errorOfWrite(const std::string& path)
+    {
+        Error error;
+        return FileCoordinator().coordinateWriting(
+                   urlOf(path), FileCoordinator::WritingOptions::none, [](const URLRef&) {}, &error)
+                   ? 0
+                   : static_cast<int>(error.code);
+    }
+    int errorOfWrite() { return errorOfWrite(item()); }
+};
+
+struct Misbehaviour {
+    const char* behaviour;
+    const char* release; // what lets the writer through when it does not come by itself
+    const char* sign;    // what is said before
+};
+
+std::size_t openDescriptors()
+{
+    return static_cast<std::size_t>(std::distance(fs::directory_iterator("/proc/self/fd"), fs::directory_iterator()));
+}
+
+std::size_t threads()
+{
+    return static_cast<std::size_t>(std::distance(fs::directory_iterator("/proc/self/task"), fs::directory_iterator()));
+}
+
+} // namespace
+
+TEST_F(FaultTest, APresenterMayNotAnswerAnswerTwiceDropTheAnswerLeaveOrSave)
+{
+    for (const Misbehaviour& one : {Misbehaviour{"never", "p answer", ""},
+                                    {"never", "p unregister", ""},
+                                    {"twice", nullptr, ""},
+                                    {"drop", nullptr, ""},
+                                    {"save", nullptr, "p saved"},
+                                    {"atonce", nullptr, ""}}) {
+        SCOPED_TRACE(std::string(one.behaviour) + (one.release != nullptr ? one.release : ""));
+        AgentProcess presenter(folder()), writer(folder()), next(folder()), reader(folder());
+        presenter.tell(std::string("p present ") + one.behaviour + " " + item());
+        ASSERT_TRUE(presenter.expect("p presents"));
+        writer.tell("w write " + item());
+        ASSERT_TRUE(presenter.expect("p asked by writer"));
+        if (one.release != nullptr) {
+            ASSERT_TRUE(awaitWaiting(writer, item(), true));
+            next.tell("n write " + item()); // behind it in the queue, and not in the way of readers
+            ASSERT_TRUE(awaitWaiting(next, item(), true));
+            reader.tell("r read " + item());
+            ASSERT_TRUE(reader.expect("r in"));
+            reader.tell("r leave");
+            EXPECT_FALSE(writer.hasSaid("w in"));
+            presenter.tell(one.release);
+        }
+        if (*one.sign != '\0') {
+            ASSERT_TRUE(presenter.expect(one.sign));
+        }
+        ASSERT_TRUE(writer.expect("w in"));
+        writer.tell("w leave");
+        ASSERT_TRUE(writer.expect("w out"));
+    }
+}
+
+TEST_F(FaultTest, ASecondRequestOfAKindWaitsForItsTurn)
+{
+    AgentProcess presenter(folder()), first(folder()), second(folder());
+    presenter.tell("p presenterlock 1 " + item());
+    presenter.tell("p retain");
+    ASSERT_TRUE(presenter.expect("p held"));
+    for (AgentProcess* reader : {&first, &second}) {
+        reader->tell("r read " + item());
+        ASSERT_TRUE(awaitWaiting(*reader, item(), false));
+    }
+    for (std::string state; !state.ends_with(" R"); state = presenter.expectStart("p count"))
+        presenter.tell("p state");
+    presenter.tell("p release");
+    for (AgentProcess* reader : {&first, &second})
+        ASSERT_TRUE(reader->expect("r in"));
+    presenter.tell("p state");
+    EXPECT_TRUE(presenter.expect("p count 0"));
+}
+
+TEST_F(FaultTest, AStoppedProcessThatHoldsNothingStopsNobody)
+{
+    AgentProcess stopped(folder()), writer(folder());
+    stopped.tell("p presenterlock 0 " + item());
+    stopped.tell("p retain");
+    ASSERT_TRUE(stopped.expect("p held"));
+    stopped.tell("p release");
+    ASSERT_TRUE(stopped.expect("p releases"));
+    stopped.tell("p state");
+    ASSERT_TRUE(stopped.expect("p count 0"));
+    ASSERT_EQ(errorOfWrite(), 0); // the accessor in which the lock was acquired has ended too
+    stopped.signal(SIGSTOP);
+    writer.tell("w write " + item());
+    EXPECT_TRUE(writer.expect("w in"));
+}
+
+TEST_F(FaultTest, AForkedChildKeepsNothingOfItsParents)
+{
+    for (const char* held : {"a presenterlock 0 ", "a coordlock 1 "}) {
+        AgentProcess parent(folder()), writer(folder());
+        parent.tell(held + item());
+        parent.tell("a retain");
+        ASSERT_TRUE(parent.expect("a held"));
+        parent.tell("fork");
+        const pid_t child = std::stoi(parent.expectStart("forked ").substr(7));
+        writer.tell("w write " + item());
+        ASSERT_TRUE(awaitWaiting(writer, item(), true));
+        parent.kill();
+        EXPECT_TRUE(writer.expect("w in"));
+        EXPECT_EQ(::kill(child, SIGKILL), 0); // it was there all the time
+    }
+}
+
+TEST_F(FaultTest, InterruptingSignalsDoNotShow)
+{
+    AgentProcess holder(folder()), presenter(folder()), writer(folder()), reader(folder());
+    for (AgentProcess* agent : {&holder, &presenter, &writer, &reader})
+        agent->tell("storm");
+    presenter.tell("p present never " + item());
+    ASSERT_TRUE(presenter.expect("p presents"));
+    holder.tell("h coordlock 0 " + item());
+    holder.tell("h retain");
+    ASSERT_TRUE(holder.expect("h held"));
+    writer.tell("w write " + item());
+    ASSERT_TRUE(presenter.expect("p asked by writer"));
+    presenter.tell("p answer");
+    ASSERT_TRUE(awaitWaiting(writer, item(), true)); // now for the reader
+    reader.tell("r read " + item());
+    holder.tell("h release");
+    writer.tell("w leave");
+    EXPECT_TRUE(writer.expect("w out"));
+    EXPECT_TRUE(reader.expect("r in"));
+}
+
+TEST_F(FaultTest, WithoutDescriptorsTheErrorSaysSo)
+{
+    AgentProcess poor(folder()), presenter(folder()), writer(folder());
+    poor.tell("limit 3"); // input, output, errors
+    ASSERT_TRUE(poor.expect("limited"));
+    poor.tell("w write " + item());
+    EXPECT_EQ(poor.expectStart("w error").substr(0, 10), "w error " + std::to_string(EMFILE));
+    poor.tell("p present atonce " + item());
+    EXPECT_EQ(poor.expectStart("p error").substr(0, 10), "p error " + std::to_string(EMFILE));
+    poor.tell("l presenterlock 0 " + item());
+    poor.tell("l retain");
+    for (std::string state; state != "l count 0"; state = poor.expectStart("l count"))
+        poor.tell("l state");
+    writer.tell("w write " + item()); // nothing was left behind
+    EXPECT_TRUE(writer.expect("w in"));
+}
+
+TEST_F(FaultTest, WithoutMemoryForLocksTheErrorSaysSoAndNothingIsHeld)
+{
+    static int left;
+    static LockCall real;
+    real = lockCall();
+    bool isDone = false;
+    for (int calls = 0; !isDone; ++calls) { // each lock call in turn
+        left = calls;
+        lockCall() = [](int descriptor, int command, void* lock) {
+            if (left-- > 0)
+                return real(descriptor, command, lock);
+            errno = ENOLCK;
+            return -1;
+        };
+        const int error = errorOfWrite();
+        isDone = left >= 0;
+        lockCall() = real;
+        EXPECT_EQ(error, isDone || error == 0 ? 0 : ENOLCK);
+        EXPECT_EQ(errorOfWrite(), 0); // waits forever when something was left
+    }
+}
+
+TEST_F(FaultTest, AFolderThatIsNotOursAloneIsRefused)
+{
+    const auto expectRefused = [&](const char* what, int error) {
+        FileCoordinator::setCoordinationFolder(folder());
+        EXPECT_EQ(errorOfWrite(), error) << what;
+        fs::remove_all(folder());
+    };
+    fs::create_directory(folder());
+    fs::permissions(folder(), fs::perms::owner_all | fs::perms::group_exec);
+    expectRefused("open to others", EACCES);
+    fs::create_directory(item("elsewhere"));
+    fs::permissions(item("elsewhere"), fs::perms::owner_all);
+    fs::create_directory_symlink(item("elsewhere"), folder());
+    expectRefused("a symbolic link", ENOTDIR);
+    std::ofstream(folder()) << "x";
+    expectRefused("a file", ENOTDIR);
+    fs::create_directory(folder());
+    fs::permissions(folder(), fs::perms::owner_all);
+    const std::string stripe =
+        folder() + "/" + CoordinationDirectory::stripeName(ItemWindow(CoordinatedItem(itemURL()).key()).stripe);
+    fs::create_symlink(item("target"), stripe);
+    expectRefused("a stripe that is a symbolic link", ELOOP);
+    if (geteuid() == 0) {
+        fs::create_directory(folder());
+        fs::permissions(folder(), fs::perms::owner_all);
+        ASSERT_EQ(chown(folder().c_str(), 65534, 65534), 0);
+        expectRefused("of another user", EACCES);
+    }
+    expectRefused("missing, and made", 0);
+    FileCoordinator::setCoordinationFolder(item("no/folder"));
+    EXPECT_EQ(errorOfWrite(), ENOENT);
+}
+
+TEST_F(FaultTest, ADeletedFolderIsMadeAgainAndWaitersFindEachOtherThere)
+{
+    AgentProcess holder(folder()), waiter(folder()), presenter(folder());
+    presenter.tell("p presenterlock 0 " + item("presented"));
+    presenter.tell("p retain");
+    ASSERT_TRUE(presenter.expect("p held"));
+    holder.tell("h write " + item());
+    ASSERT_TRUE(holder.expect("h in"));
+    waiter.tell("w write " + item());
+    ASSERT_TRUE(awaitWaiting(waiter, item(), true));
+    fs::remove_all(folder());
+    ASSERT_EQ(errorOfWrite(item("other")), 0); // makes it again
+    ASSERT_TRUE(fs::exists(folder()));
+    holder.tell("h leave");
+    ASSERT_TRUE(waiter.expect("w in")); // in the new folder, where another finds it
+    AgentProcess late(folder());
+    late.tell("l write " + item());
+    ASSERT_TRUE(awaitWaiting(late, item(), true));
+    waiter.tell("w leave");
+    ASSERT_TRUE(late.expect("l in"));
+    // A presenter that notices takes what it holds along.
+    presenter.tell("q presenterlock 0 " + item("more"));
+    presenter.tell("q retain");
+    ASSERT_TRUE(presenter.expect("q held"));
+    late.tell("m write " + item("presented"));
+    ASSERT_TRUE(awaitWaiting(late, item("presented"), true));
+    presenter.tell("p release");
+    EXPECT_TRUE(late.expect("m in"));
+}
+
+TEST_F(FaultTest, WithoutTicketsAccessStillExcludesAndEnds)
+{
+    const ItemWindow window(CoordinatedItem(itemURL()).key());
+    AgentProcess holder(folder()), writer(folder()), reader(folder());
+    holder.tell("h write " + item());
+    ASSERT_TRUE(holder.expect("h in"));
+    Descriptor last = CoordinationDirectory::current()->takeStripe(window.stripe);
+    ASSERT_TRUE(tryLock(last.get(), window.range(kWriterTickets + kTicketCount - 1), LockKind::exclusive));
+    writer.tell("w write " + item());
+    reader.tell("r read " + item());
+    ASSERT_TRUE(awaitWaiting(reader, item(), false));
+    ASSERT_TRUE(awaitWaiting(writer, item(), false));
+    holder.tell("h leave");
+    ASSERT_TRUE(holder.expect("h out"));
+    EXPECT_FALSE(writer.hasSaid("w in") || reader.hasSaid("r in")); // the ticket is ahead of both
+    unlock(last.get(), window.whole());
+    writer.tell("w leave");
+    reader.tell("r leave");
+    EXPECT_TRUE(writer.expect("w out"));
+    EXPECT_TRUE(reader.expect("r out"));
+}
+
+TEST_F(FaultTest, AFileMayBeCreatedReplacedAndRenamedWhileItIsLocked)
+{
+    for (const char* step : {"created", "replaced", "renamed", "linked"}) {
+        SCOPED_TRACE(step);
+        const std::string path = item(std::string(step) + ".wav");
+        AgentProcess holder(folder()), writer(folder());
+        if (std::string(step) != "created")
+            std::ofstream(path) << "old";
+        holder.tell("h presenterlock 0 " + path);
+        holder.tell("h retain");
+        ASSERT_TRUE(holder.expect("h held"));
+        std::string asked = path;
+        if (std::string(step) == "created") {
+            std::ofstream(path) << "new";
+        } else if (std::string(step) == "replaced") {
+            std::ofstream(item("fresh")) << "new";
+            fs::rename(item("fresh"), path);
+        } else if (std::string(step) == "renamed") {
+            fs::rename(path, item("away.wav")); // the lock is the name's
+        } else {
+            fs::create_directory_symlink(fs::path(path).parent_path(), item("folder"));
+            asked = item("folder/linked.wav");
+        }
+        writer.tell("w write " + asked);
+        ASSERT_TRUE(awaitWaiting(writer, asked, true));
+        holder.tell("h release");
+        EXPECT_TRUE(writer.expect("w in"));
+    }
+}
+
+TEST_F(FaultTest, DescriptorsThreadsAndTheFolderReturnToTheirLevel)
+{
+    constexpr std::size_t kMany = 500, kPool = 32;
+    std::thread([] {}).join(); // a sanitizer begins a thread of its own with the first
+    const auto before = std::pair(openDescriptors(), threads());
+    std::vector<std::shared_ptr<KTFilePresenterLock>> held;
+    std::mutex mutex;
+    std::condition_variable changed;
+    std::size_t called = 0, entered = 0;
+    for (std::size_t i = 0; i < kMany; ++i) {
+        held.push_back(KTFilePresenterLock::initLockWithType(KTFilePresenterLock::LockType::readersAndWriters,
+                                                             urlOf(item("song-" + std::to_string(i)))));
+        held.back()->retainLockWithFinishedHandler([&] {
+            const std::lock_guard guard(mutex);
+            ++called;
+            changed.notify_all();
+        });
+    }
+    {
+        std::unique_lock guard(mutex);
+        changed.wait(guard, [&] { return called == kMany; });
+    }
+    std::vector<std::thread> waiting;
+    for (const auto& lock : held)
+        waiting.emplace_back([&, url = lock->url()] {
+            FileCoordinator().coordinateWriting(url, FileCoordinator::WritingOptions::none, [&](const URLRef&) {
+                const std::lock_guard guard(mutex);
+                ++entered;
+            });
+        });
+    for (const auto& lock : held)
+        while (!lock->isWriterWaiting())
+            std::this_thread::yield();
+    EXPECT_EQ(entered, 0u);
+    for (const auto& lock : held)
+        lock->releaseLock();
+    for (std::thread& thread : waiting)
+        thread.join();
+    EXPECT_EQ(entered, kMany);
+    held.clear();
+    while (threads() > before.second) // those that wait for more work end by themselves
+        std::this_thread::yield();
+    EXPECT_LE(openDescriptors(), before.first + kPool);
+    for (const auto& entry : fs::directory_iterator(folder()))
+        EXPECT_TRUE(fs::is_regular_file(entry) && fs::file_size(entry) == 0) << entry; // no socket is left
+}
+
+TEST_F(FaultTest, TwoCopiesOfTheLibraryInAProcessHoldEachOtherBack)
+{
+    void* copy = dlopen(KTFILES_COPY, RTLD_NOW | RTLD_LOCAL);
+    ASSERT_NE(copy, nullptr) << dlerror();
+    using Write = bool (*)(const char*, const char*, void (*)(void*), void*);
+    const auto writeInCopy = reinterpret_cast<Write>(dlsym(copy, "writeInCopy"));
+    ASSERT_NE(writeInCopy, nullptr);
+    const auto lock =
+        KTFilePresenterLock::initLockWithType(KTFilePresenterLock::LockType::readersAndWriters, itemURL());
+    std::promise<void> isHeld;
+    lock->retainLockWithFinishedHandler([&] { isHeld.set_value(); });
+    isHeld.get_future().wait();
+    std::atomic<bool> isReleased = false;
+    struct Entry {
+        std::atomic<bool>& isReleased;
+        bool wasReleased = false;
+    } entry{isReleased};
+    std::thread other([&] {
+        EXPECT_TRUE(writeInCopy(
+            folder().c_str(), item().c_str(),
+            [](void* context) {
+                Entry& mine = *static_cast<Entry*>(context);
+                mine.wasReleased = mine.isReleased;
+            },
+            &entry));
+    });
+    while (!lock->isWriterWaiting()) // asked through the slot of the first copy, by an access of the second
+        std::this_thread::yield();
+    isReleased = true;
+    lock->releaseLock();
+    other.join();
+    EXPECT_TRUE(entry.wasReleased);
+}
+
+TEST_F(FaultTest, AURLWithoutAPathIsRefused)
+{
+    Error error;
+    for (const URLRef& url : {URLRef(), URL::createWithString("https://example.com/a.wav")}) {
+        EXPECT_FALSE(FileCoordinator().coordinateReading(
+            url, FileCoordinator::ReadingOptions::none, [](const URLRef&) { FAIL(); }, &error));
+        EXPECT_EQ(error.code, kStatusBadReference);
+    }
+}

@@ -1,0 +1,33 @@
+// A process under the tests' command: reads lines, does what they say, and writes a line for whatever happens.
+#pragma once
+
+#include "platform/FileCoordination.h"
+
+#include <functional>
+#include <map>
+#include <memory>
+#include <mutex>
+#include <string>
+
+/// What a command made, by the name that the command gave it.
+class Actor {
+public:
+    virtual ~Actor() = default;
+    virtual void command(const std::string& verb) = 0;
+};
+
+void say(const std::string& line);
+platform::URLRef urlOf(const std::string& path);
+
+/// "read", "write": a coordinated access that ends with the command "leave".
+std::unique_ptr<Actor> makeAccess(const std::string& name, bool isWriting, const std::string& path);
+/// "presenterlock TYPE", "coordlock TYPE": take "retain", "release", "reset", "state".
+std::unique_ptr<Actor> makePresenterLock(const std::string& name, unsigned type, const std::string& path);
+std::unique_ptr<Actor> makeCoordinationLock(const std::string& name, unsigned type, const std::string& path);
+/// "present BEHAVIOUR": never, twice, drop, save or atonce; takes "answer" and "unregister".
+std::unique_ptr<Actor> makePresenter(const std::string& name, const std::string& behaviour, const std::string& path);
+
+/// Random accesses and locks on the item at `path` until `isOver`, each witnessed by record locks on another file,
+/// which the kernel drops before those of the service when a process is killed. Says "violation" when a witness is in
+/// the way.
+void churn(unsigned seed, const std::string& path, const std::string& witness, const std::function<bool()>& isOver);

@@ -1,11 +1,13 @@
-// ADM documents: parsing against bare libxml2, which is pushed the same bytes and calls functions that do nothing; and
-// looking IDs up.
+// ADM documents: parsing against bare libxml2, which is pushed the same bytes and calls functions that do nothing; looking
+// IDs up; and the command.
 #include "ADMDocuments.h"
 #include "adm/ADMDocument.h"
 
 #include <benchmark/benchmark.h>
 
 #include <libxml/parser.h>
+#include <sys/resource.h>
+#include <sys/wait.h>
 
 #include <algorithm>
 #include <array>
@@ -178,5 +180,45 @@ void FindADMElement(benchmark::State& state)
     }
 }
 BENCHMARK(FindADMElement)->UseManualTime()->Unit(benchmark::kNanosecond)->Iterations(10);
+
+/// Of the processes that were waited for.
+double childrenSeconds()
+{
+    rusage usage{};
+    getrusage(RUSAGE_CHILDREN, &usage);
+    const auto seconds = [](const timeval& time) {
+        return static_cast<double>(time.tv_sec) + static_cast<double>(time.tv_usec) * 1e-6;
+    };
+    return seconds(usage.ru_utime) + seconds(usage.ru_stime);
+}
+
+/// `ktfiles adm --json` as a process, beside the library's parse of the same file.
+void ADMCommandJson(benchmark::State& state)
+{
+    const DocumentFile file(kLarge);
+    const std::string command = "'" KTFILES_COMMAND "' adm --json '" + file.path() + "' > /dev/null";
+    double parse = 1e9, json = 1e9;
+    for (auto _ : state) {
+        double start = cpuSeconds();
+        {
+            ADMDocument document(std::make_unique<FileStream>(file.path()));
+            if (!document.parse())
+                state.SkipWithError("the document is not read");
+        }
+        parse = std::min(parse, cpuSeconds() - start);
+
+        start = childrenSeconds();
+        const int result = std::system(command.c_str());
+        if (!WIFEXITED(result) || WEXITSTATUS(result) != 0)
+            state.SkipWithError("ktfiles adm failed");
+        const double seconds = childrenSeconds() - start;
+        json = std::min(json, seconds);
+        state.SetIterationTime(seconds);
+    }
+    state.counters["parse_s"] = parse;
+    state.counters["json_s"] = json;
+    state.counters["times_parse"] = json / parse; // at most 2
+}
+BENCHMARK(ADMCommandJson)->UseManualTime()->Unit(benchmark::kMillisecond)->Iterations(8);
 
 } // namespace

@@ -2,7 +2,6 @@
 #include "ChunkBody.h"
 #include "ChunksCommand.h"
 #include "CommandLine.h"
-#include "EditGuards.h"
 #include "Failure.h"
 #include "InputFile.h"
 #include "OutputFile.h"
@@ -62,15 +61,10 @@ void getChunk(const GetArguments& arguments, const OutputOptions& options)
 {
     CAudioFileIO file;
     openContainer(file, arguments.file, 0);
-    const ChunkSurvey survey = surveyChunks(file, arguments.id);
+    const ChunkBody chunk = requireChunk(file, arguments.id);
     const std::string id = fourCCText(arguments.id);
-    if (!survey.found)
-        throw Failure("has no chunk \"" + id + "\"");
-    const std::int64_t offset = bodyOffset(*survey.found, survey.extent);
-    const std::int64_t size = survey.found->size;
-    const std::int64_t there = std::max<std::int64_t>(survey.extent.fileLength - offset, 0);
-    if (size < 0 || size > there)
-        throw Failure(fmt::format("its chunk \"{}\" claims {} bytes, but {} are there", id, size, there));
+    const std::int64_t offset = chunk.offset;
+    const std::int64_t size = chunk.size;
     if (arguments.out.empty() || arguments.out == "-")
         getToOutput(file, offset, size, options.quiet, arguments.out == "-");
     else
@@ -78,7 +72,7 @@ void getChunk(const GetArguments& arguments, const OutputOptions& options)
                         [&](const Sink& sink) { copyBody(file, offset, size, options.quiet, sink); });
     if (options.json)
         Output::standard().print(
-            "{}\n", jsonText({{"path", arguments.file}, {"id", id}, {"offset", survey.found->offset}, {"size", size}}));
+            "{}\n", jsonText({{"path", arguments.file}, {"id", id}, {"offset", chunk.header}, {"size", size}}));
 }
 
 } // namespace

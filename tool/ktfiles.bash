@@ -18,10 +18,10 @@ _ktfiles()
     esac
 
     if ((cword == 1)); then
-        COMPREPLY=($(compgen -W 'info chunks tags scan overview help --help --version' -- "$cur"))
+        COMPREPLY=($(compgen -W 'info chunks tags scan overview adm help --help --version' -- "$cur"))
     elif [[ $verb == help ]]; then
         if ((cword == 2)); then
-            COMPREPLY=($(compgen -W 'info chunks tags scan overview' -- "$cur"))
+            COMPREPLY=($(compgen -W 'info chunks tags scan overview adm' -- "$cur"))
         elif ((cword == 3)) && [[ $object == chunks ]]; then
             COMPREPLY=($(compgen -W 'get add remove' -- "$cur"))
         elif ((cword == 3)) && [[ $object == tags ]]; then
@@ -32,6 +32,7 @@ _ktfiles()
             chunks/get) COMPREPLY=($(compgen -W "--output $common" -- "$cur")) ;;
             chunks/add) COMPREPLY=($(compgen -W "--from --replace --force $edit $common" -- "$cur")) ;;
             chunks/remove) COMPREPLY=($(compgen -W "--force $edit $common" -- "$cur")) ;;
+            adm/*) COMPREPLY=($(compgen -W "--long --lenient --check $common" -- "$cur")) ;;
             tags/set | tags/remove | tags/copy) COMPREPLY=($(compgen -W "$edit $common" -- "$cur")) ;;
             overview/*) COMPREPLY=($(compgen -W "--png --svg --width --height --start --end --scale --colors --stored
                 --store $edit $common" -- "$cur")) ;;

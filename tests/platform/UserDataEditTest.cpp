@@ -328,6 +328,23 @@ TEST(UserDataEdit, MissingPadsAheadOfAnIdThatBeginsWithZero)
     }
 }
 
+// The "ds64" holds the size of the first "data". Once, putting a second one right gave its size to the first.
+TEST(UserDataEdit, ASecondDataChunkHasASizeOfItsOwn)
+{
+    constexpr FourCC rf64 = fourCC("RF64");
+    TemporaryFolder folder;
+    Bytes bytes = buildContainer(rf64, {formatChunk(rf64), dataChunk(rf64), {fourCC("late"), "12345678"}});
+    const auto late = static_cast<std::size_t>(bytes.size() - 16);
+    storeBE(bytes.data() + late, fourCC("data"));
+    storeLE(bytes.data() + late + 4, std::uint32_t{1000}); // beyond the end of the file
+    const auto file = openAudio(folder.write("file", bytes));
+    ASSERT_EQ(setItem(*file, kItem, 0, "item"), 0);
+    std::uint64_t count = 0;
+    EXPECT_EQ(file->audioDataByteCount(count), 0);
+    EXPECT_EQ(count, testSamples.size());
+    EXPECT_EQ(itemsOf(*file, kItem), std::vector<std::string>{"item"});
+}
+
 // An id of zeros with a size beyond the end: put right, it would be all zeros, and nothing behind it would be found.
 TEST(UserDataEdit, NothingIsPutBehindAHeaderOfZerosThatEndsTheFile)
 {

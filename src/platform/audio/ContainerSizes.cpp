@@ -74,7 +74,8 @@ std::int32_t writeLastChunkSize(const FileBytes& file, ContainerLayout& layout, 
 {
     Chunk& chunk = layout.chunks.back();
     const std::uint64_t position = chunk.position + 4;
-    const bool isData = chunk.id == layout.audioDataId();
+    // The "ds64" speaks of the first one; a further one has its own 32 bits.
+    const bool isData = layout.find(layout.audioDataId()) == &chunk;
     std::int32_t status = kStatusOK;
     if (layout.kind == ContainerKind::caf) {
         status = overwriteNumber(file, position, size, std::endian::big);

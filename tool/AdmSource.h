@@ -1,0 +1,28 @@
+// Where the XML of an ADM document comes from: a file of its own, or the chunk "axml" of an audio file.
+#pragma once
+
+#include "audiofile/CAudioFileIO.h"
+#include "platform/InputStream.h"
+
+#include <cstdint>
+#include <memory>
+#include <string>
+
+/// An open file, read in pieces.
+class AdmSource {
+public:
+    /// Throws Failure: also for what is neither XML nor a container, and for a container without the chunk.
+    explicit AdmSource(const std::string& path);
+
+    /// Bytes of XML. NUL bytes at the end, which some programs reserve in the chunk, do not count.
+    std::int64_t size() const { return end_ - begin_; }
+    /// Must not outlive the source.
+    std::unique_ptr<platform::InputStream> stream();
+
+private:
+    void dropTrailingNuls();
+
+    CAudioFileIO file_;
+    std::int64_t begin_ = 0;
+    std::int64_t end_ = 0;
+};

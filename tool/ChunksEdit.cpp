@@ -4,6 +4,7 @@
 #include "EditGuards.h"
 #include "Failure.h"
 #include "InputFile.h"
+#include "SidecarChunks.h"
 
 #include <nlohmann/json.hpp>
 
@@ -21,6 +22,7 @@ struct EditArguments {
     std::string from;     // of "add"
     bool replace = false; // of "add"
     bool force = false;
+    std::string sidecar; // the extension; empty: only the container itself
     EditOptions options;
 };
 
@@ -92,6 +94,12 @@ void refuseUnlessForced(const std::optional<std::string>& objection, bool force)
         throw Failure(*objection + "; --force does it all the same");
 }
 
+void refuseBackup(const EditArguments& arguments)
+{
+    if (arguments.options.backup)
+        throw Failure("keeps its chunks beside it and is not changed: there is nothing to back up");
+}
+
 ChunkSurvey survey(const std::string& path, FourCC id)
 {
     CAudioFileIO file;
@@ -142,6 +150,7 @@ struct EditReport {
     std::int64_t size;  // bytes of their bodies
     std::int64_t replaced = 0;
     std::string backup = {};
+    std::string where = {}; // the file that was changed, if not the one that was named
 };
 
 void print(const EditArguments& arguments, const OutputOptions& output, const EditReport& report)
@@ -156,6 +165,8 @@ void print(const EditArguments& arguments, const OutputOptions& output, const Ed
         if (adds)
             json["replaced"] = report.replaced;
         json["dryRun"] = arguments.options.dryRun;
+        if (!report.where.empty())
+            json["where"] = report.where;
         if (!report.backup.empty())
             json["backup"] = report.backup;
         Output::standard().print("{}\n", jsonText(json));
@@ -163,11 +174,50 @@ void print(const EditArguments& arguments, const OutputOptions& output, const Ed
         const std::string what = report.count == 1 ? "chunk" : fmt::format("{} chunks", report.count);
         const char* const verb =
             arguments.options.dryRun ? (adds ? "would add" : "would remove") : (adds ? "added" : "removed");
-        Output::standard().print("{}: {} {} \"{}\", {} bytes{}{}\n", printable(arguments.file), verb, what,
-                                 fourCCText(arguments.id), report.size,
+        Output::standard().print("{}: {} {} \"{}\"{}{}{}{}\n", printable(arguments.file), verb, what,
+                                 fourCCText(arguments.id),
+                                 report.size < 0 ? "" : fmt::format(", {} bytes", report.size),
+                                 report.where.empty() ? "" : ", in " + printable(report.where),
                                  report.replaced > 0 ? fmt::format(", in the place of {}", report.replaced) : "",
                                  report.backup.empty() ? "" : "; backup " + printable(report.backup));
     }
+}
+
+// With a sidecar every older copy goes, so that a container's own must be one that may.
+void addAnywhereOrRefuse(const EditArguments& arguments, const OutputOptions& output, const Bytes& body)
+{
+    SafeEdit edit(arguments.file, arguments.options);
+    const bool inFile = keepsItsChunks(edit.target());
+    if (!inFile)
+        refuseBackup(arguments);
+    EditReport report{"add", 1, std::ssize(body)};
+    if (inFile) {
+        CAudioFileIO file;
+        openContainer(file, edit.target(), 0);
+        const ChunkSurvey found = surveyChunks(file, arguments.id);
+        refuseUnlessForced(objectionToAdding(file, found, arguments.id, report.size), arguments.force);
+        report.replaced = found.count;
+    }
+    SidecarEdit done = addAnywhere(edit, arguments.id, body, arguments.sidecar, arguments.options.dryRun);
+    report.backup = done.backup;
+    if (!inFile)
+        report.where = done.where;
+    print(arguments, output, report);
+}
+
+void removeEverywhereOrRefuse(const EditArguments& arguments, const OutputOptions& output)
+{
+    SafeEdit edit(arguments.file, arguments.options);
+    if (keepsItsChunks(edit.target()))
+        refuseUnlessForced(objectionToRemoving(survey(edit.target(), arguments.id), arguments.id), arguments.force);
+    else
+        refuseBackup(arguments);
+    EditReport report{"remove", 0, -1};
+    SidecarEdit done = removeEverywhere(edit, arguments.id, arguments.sidecar, arguments.options.dryRun, report.count);
+    report.backup = done.backup;
+    if (done.where != edit.target())
+        report.where = done.where;
+    print(arguments, output, report);
 }
 
 void addChunk(const EditArguments& arguments, const OutputOptions& output)
@@ -176,6 +226,8 @@ void addChunk(const EditArguments& arguments, const OutputOptions& output)
     if (arguments.id == 0)
         throw Failure("an id of four zero bytes cannot be told from no chunk");
     const Bytes body = readAll(arguments.from);
+    if (!arguments.sidecar.empty())
+        return addAnywhereOrRefuse(arguments, output, body);
     SafeEdit edit(arguments.file, arguments.options);
     EditReport report{"add", 1, static_cast<std::int64_t>(body.size())};
     {
@@ -192,6 +244,8 @@ void addChunk(const EditArguments& arguments, const OutputOptions& output)
 
 void removeChunks(const EditArguments& arguments, const OutputOptions& output)
 {
+    if (!arguments.sidecar.empty())
+        return removeEverywhereOrRefuse(arguments, output);
     SafeEdit edit(arguments.file, arguments.options);
     const ChunkSurvey found = survey(edit.target(), arguments.id);
     if (found.count == 0)
@@ -217,6 +271,7 @@ CLI::App& declareEdit(CommandLine& commandLine, CLI::App& chunks, const std::str
     CommandLine::addFile(verb, arguments.file)->required();
     CommandLine::addChunkId(verb, arguments.id)->required();
     verb.add_flag("--force", arguments.force, "Do it even where sound or other data would be lost");
+    addSidecarOption(verb, arguments.sidecar);
     CommandLine::addEditOptions(verb, arguments.options);
     return verb;
 }

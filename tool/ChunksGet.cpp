@@ -6,6 +6,7 @@
 #include "InputFile.h"
 #include "OutputFile.h"
 #include "Progress.h"
+#include "SidecarChunks.h"
 
 #include <nlohmann/json.hpp>
 
@@ -20,6 +21,7 @@ struct GetArguments {
     std::string file;
     FourCC id = 0;
     std::string out;
+    std::string sidecar; // the extension; empty: only the container itself
 };
 
 // A body that would do mischief on a terminal; text, as in "iXML" and "axml", is welcome there.
@@ -30,6 +32,9 @@ bool isBinary(std::string_view bytes)
         return (byte < 0x20 && c != '\n' && c != '\r' && c != '\t') || byte == 0x7F;
     });
 }
+
+/// Hands a body to the sink, piece by piece.
+using Source = std::function<void(const Sink&)>;
 
 void copyBody(CAudioFileIO& file, std::int64_t offset, std::int64_t size, bool quiet, const Sink& sink)
 {
@@ -44,11 +49,11 @@ void copyBody(CAudioFileIO& file, std::int64_t offset, std::int64_t size, bool q
     }
 }
 
-void getToOutput(CAudioFileIO& file, std::int64_t offset, std::int64_t size, bool quiet, bool anyBytes)
+void getToOutput(const Source& body, bool anyBytes)
 {
     Output& output = Output::standard();
     const bool careful = !anyBytes && isTerminal(STDOUT_FILENO);
-    copyBody(file, offset, size, quiet, [&](std::string_view bytes) {
+    body([&](std::string_view bytes) {
         if (careful && isBinary(bytes))
             throw Failure("the chunk is not text: name a file with -o OUT, or show it all the same with -o -");
         output.write(bytes);
@@ -57,22 +62,37 @@ void getToOutput(CAudioFileIO& file, std::int64_t offset, std::int64_t size, boo
     });
 }
 
+void put(const Source& body, const GetArguments& arguments)
+{
+    if (arguments.out.empty() || arguments.out == "-")
+        getToOutput(body, arguments.out == "-");
+    else
+        writeOutputFile(arguments.out, arguments.file, body);
+}
+
+void getFromAnywhere(const GetArguments& arguments, const OutputOptions& options)
+{
+    const SidecarChunk chunk = readFromAnywhere(arguments.file, arguments.id, arguments.sidecar);
+    put([&](const Sink& sink) { sink(textOf(chunk.body)); }, arguments);
+    if (options.json)
+        Output::standard().print("{}\n", jsonText({{"path", arguments.file},
+                                                   {"id", fourCCText(arguments.id)},
+                                                   {"source", chunk.source},
+                                                   {"size", chunk.body.size()}}));
+}
+
 void getChunk(const GetArguments& arguments, const OutputOptions& options)
 {
+    if (!arguments.sidecar.empty())
+        return getFromAnywhere(arguments, options);
     CAudioFileIO file;
     openContainer(file, arguments.file, 0);
     const ChunkBody chunk = requireChunk(file, arguments.id);
     const std::string id = fourCCText(arguments.id);
-    const std::int64_t offset = chunk.offset;
-    const std::int64_t size = chunk.size;
-    if (arguments.out.empty() || arguments.out == "-")
-        getToOutput(file, offset, size, options.quiet, arguments.out == "-");
-    else
-        writeOutputFile(arguments.out, arguments.file,
-                        [&](const Sink& sink) { copyBody(file, offset, size, options.quiet, sink); });
+    put([&](const Sink& sink) { copyBody(file, chunk.offset, chunk.size, options.quiet, sink); }, arguments);
     if (options.json)
         Output::standard().print(
-            "{}\n", jsonText({{"path", arguments.file}, {"id", id}, {"offset", chunk.header}, {"size", size}}));
+            "{}\n", jsonText({{"path", arguments.file}, {"id", id}, {"offset", chunk.header}, {"size", chunk.size}}));
 }
 
 } // namespace
@@ -91,4 +111,5 @@ void declareChunksGet(CommandLine& commandLine, CLI::App& chunks)
     CommandLine::addFile(verb, arguments.file)->required();
     CommandLine::addChunkId(verb, arguments.id)->required();
     CommandLine::addPath(verb, "-o,--output", arguments.out, "The file to write")->option_text("OUT");
+    addSidecarOption(verb, arguments.sidecar);
 }

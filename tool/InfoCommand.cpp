@@ -2,6 +2,7 @@
 #include "ClockTime.h"
 #include "CommandLine.h"
 #include "Failure.h"
+#include "FileFacts.h"
 #include "InputFile.h"
 #include "Table.h"
 
@@ -66,37 +67,62 @@ std::string formatText(const AudioFileInfo& info)
     return fmt::format("{}-bit{}", info.bitsPerSample, info.floatingPoint ? " float" : "");
 }
 
-nlohmann::ordered_json asJson(const std::string& path, const AudioFileInfo& info)
+std::string typeByNameText(const FileFacts& facts)
 {
-    return {{"path", path},
-            {"container", fourCCText(info.containerId)},
-            {"fileType", fourCCText(info.fileType)},
-            {"formatCode", fourCCText(info.formatCode)},
-            {"sampleRate", info.sampleRate},
-            {"bitsPerSample", info.bitsPerSample},
-            {"channels", info.channels},
-            {"floatingPoint", info.floatingPoint},
-            {"frames", info.frames},
-            {"durationSeconds", durationOf(info)},
-            {"dataOffset", info.dataOffset},
-            {"fileLength", info.fileLength}};
+    return facts.typeByName != 0 ? fourCCText(facts.typeByName) : "";
+}
+
+nlohmann::ordered_json asJson(const std::string& path, const AudioFileInfo& info, const FileFacts& facts)
+{
+    nlohmann::ordered_json json = {{"path", path},
+                                   {"container", fourCCText(info.containerId)},
+                                   {"fileType", fourCCText(info.fileType)},
+                                   {"formatCode", fourCCText(info.formatCode)},
+                                   {"sampleRate", info.sampleRate},
+                                   {"bitsPerSample", info.bitsPerSample},
+                                   {"channels", info.channels},
+                                   {"floatingPoint", info.floatingPoint},
+                                   {"frames", info.frames},
+                                   {"durationSeconds", durationOf(info)},
+                                   {"dataOffset", info.dataOffset},
+                                   {"fileLength", info.fileLength},
+                                   {"typeByName", typeByNameText(facts)},
+                                   {"modified", dateText(facts.modified)}};
+    if (facts.stereo) {
+        json["stereoPartner"] = facts.stereo->partner;
+        json["stereoPartnerExists"] = facts.stereo->partnerExists;
+    }
+    return json;
+}
+
+std::vector<Table::Column> columns(bool isLong)
+{
+    std::vector<Table::Column> titles{{"FILE"},   {"TYPE"},    {"DURATION", Align::right}, {"RATE", Align::right},
+                                      {"FORMAT"}, {"CHANNELS"}};
+    if (isLong)
+        titles.insert(titles.end(), {{"BY NAME"}, {"MODIFIED"}, {"STEREO PARTNER"}});
+    return titles;
 }
 
 // Writes the descriptions in one of the forms, each as soon as it is known where the form allows that.
 class InfoWriter {
 public:
-    explicit InfoWriter(const OutputOptions& options) : form_(outputForm(options)), color_(usesColor(options.color)) {}
+    InfoWriter(const OutputOptions& options, bool isLong)
+        : form_(outputForm(options)),
+          color_(usesColor(options.color)),
+          isLong_(isLong)
+    {
+    }
 
     void add(const std::string& path, const AudioFileInfo& info)
     {
+        const FileFacts facts = form_ == Form::json || isLong_ ? factsOf(path) : FileFacts();
         if (form_ == Form::json)
-            addJson(asJson(path, info));
+            addJson(asJson(path, info, facts));
         else if (form_ == Form::table)
-            table_.add({printable(path), containerText(info), durationText(durationOf(info)), rateText(info),
-                        formatText(info), channelsText(info.channels)});
+            addRow(path, info, facts);
         else if (form_ == Form::lines)
-            output_.print("{}\t{}\t{:.6f}\t{}\t{}\t{}\n", printable(path), containerText(info), durationOf(info),
-                          info.sampleRate, formatText(info), info.channels);
+            addLine(path, info, facts);
     }
 
     void addFailure(const std::string& path, const std::string& text)
@@ -113,6 +139,32 @@ public:
     }
 
 private:
+    void addRow(const std::string& path, const AudioFileInfo& info, const FileFacts& facts)
+    {
+        std::vector<std::string> row{printable(path), containerText(info), durationText(durationOf(info)),
+                                     rateText(info),  formatText(info),    channelsText(info.channels)};
+        if (isLong_) {
+            const auto& stereo = facts.stereo;
+            row.push_back(typeByNameText(facts));
+            row.push_back(localDateText(facts.modified));
+            row.push_back(stereo ? printable(stereo->partner) + (stereo->partnerExists ? "" : " (missing)") : "");
+        }
+        table_.add(std::move(row));
+    }
+
+    void addLine(const std::string& path, const AudioFileInfo& info, const FileFacts& facts)
+    {
+        output_.print("{}\t{}\t{:.6f}\t{}\t{}\t{}", printable(path), containerText(info), durationOf(info),
+                      info.sampleRate, formatText(info), info.channels);
+        if (isLong_)
+            output_.print("\t{}\t{}\t{}\t{}", typeByNameText(facts), dateText(facts.modified),
+                          facts.stereo ? printable(facts.stereo->partner) : "",
+                          !facts.stereo                 ? ""
+                          : facts.stereo->partnerExists ? "there"
+                                                        : "missing");
+        output_.write("\n");
+    }
+
     void addJson(const nlohmann::ordered_json& object)
     {
         output_.print("{}{}", std::exchange(first_, false) ? "[\n" : ",\n", jsonText(object));
@@ -120,14 +172,15 @@ private:
 
     Form form_;
     bool color_;
+    bool isLong_;
     bool first_ = true;
     Output& output_ = Output::standard();
-    Table table_{{{"FILE"}, {"TYPE"}, {"DURATION", Align::right}, {"RATE", Align::right}, {"FORMAT"}, {"CHANNELS"}}};
+    Table table_{columns(isLong_)};
 };
 
-bool runInfo(const std::vector<std::string>& files, const OutputOptions& options)
+bool runInfo(const std::vector<std::string>& files, bool isLong, const OutputOptions& options)
 {
-    InfoWriter writer(options);
+    InfoWriter writer(options, isLong);
     bool good = true;
     for (const std::string& path : files) {
         if (Output::standard().failed())
@@ -147,9 +200,11 @@ bool runInfo(const std::vector<std::string>& files, const OutputOptions& options
 void declareInfo(CommandLine& commandLine)
 {
     static std::vector<std::string> files;
+    static bool isLong = false;
     CLI::App& verb = commandLine.addVerb("info", "Say what audio files are: length, rate, format, channels",
-                                         [&commandLine] { return runInfo(files, commandLine.output()); });
+                                         [&commandLine] { return runInfo(files, isLong, commandLine.output()); });
     CommandLine::addFiles(verb, files)->required();
+    verb.add_flag("-l,--long", isLong, "Also the type by the name, the date of modification and the stereo partner");
 }
 
 const VerbRegistration registration{10, declareInfo};

@@ -13,15 +13,16 @@ _ktfiles()
     case $prev in
         --color) COMPREPLY=($(compgen -W 'auto always never' -- "$cur")); return ;;
         --from | -o | --output | --png | --svg) _filedir; return ;;
+        --sidecar) return ;;
         --colors) COMPREPLY=($(compgen -W 'night day amber rose ink' -- "$cur")); return ;;
         --width | --height | --start | --end) return ;;
     esac
 
     if ((cword == 1)); then
-        COMPREPLY=($(compgen -W 'info chunks tags scan overview adm help --help --version' -- "$cur"))
+        COMPREPLY=($(compgen -W 'info pair chunks tags scan overview adm help --help --version' -- "$cur"))
     elif [[ $verb == help ]]; then
         if ((cword == 2)); then
-            COMPREPLY=($(compgen -W 'info chunks tags scan overview adm' -- "$cur"))
+            COMPREPLY=($(compgen -W 'info pair chunks tags scan overview adm' -- "$cur"))
         elif ((cword == 3)) && [[ $object == chunks ]]; then
             COMPREPLY=($(compgen -W 'get add remove' -- "$cur"))
         elif ((cword == 3)) && [[ $object == tags ]]; then
@@ -29,9 +30,10 @@ _ktfiles()
         fi
     elif [[ $cur == -* ]]; then
         case $verb/$object in
-            chunks/get) COMPREPLY=($(compgen -W "--output $common" -- "$cur")) ;;
-            chunks/add) COMPREPLY=($(compgen -W "--from --replace --force $edit $common" -- "$cur")) ;;
-            chunks/remove) COMPREPLY=($(compgen -W "--force $edit $common" -- "$cur")) ;;
+            info/*) COMPREPLY=($(compgen -W "--long $common" -- "$cur")) ;;
+            chunks/get) COMPREPLY=($(compgen -W "--output --sidecar $common" -- "$cur")) ;;
+            chunks/add) COMPREPLY=($(compgen -W "--from --replace --sidecar --force $edit $common" -- "$cur")) ;;
+            chunks/remove) COMPREPLY=($(compgen -W "--sidecar --force $edit $common" -- "$cur")) ;;
             adm/*) COMPREPLY=($(compgen -W "--long --lenient --check $common" -- "$cur")) ;;
             tags/set | tags/remove | tags/copy) COMPREPLY=($(compgen -W "$edit $common" -- "$cur")) ;;
             overview/*) COMPREPLY=($(compgen -W "--png --svg --width --height --start --end --scale --colors --stored

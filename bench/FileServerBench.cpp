@@ -1,0 +1,93 @@
+// The registry of shared samples: a thousand files of one second, beside libsndfile reading them as floats, and what a
+// further client of a registered file costs.
+#include "LoopFiles.h"
+#include "audiofile/CAudioFileIO.h"
+#include "files/registry/CFileServer.h"
+
+#include <benchmark/benchmark.h>
+#include <sndfile.h>
+
+#include <cmath>
+#include <memory>
+
+namespace {
+
+constexpr int kFiles = 1000;
+constexpr long kFrames = 44100;
+
+/// Half of them mono, half stereo, 16-bit WAVE.
+const std::vector<CFileRef>& sampleFiles()
+{
+    static const BenchFolder folder;
+    static const std::vector<CFileRef> files = [] {
+        std::vector<CFileRef> made;
+        std::vector<float> samples(2 * kFrames);
+        for (std::size_t i = 0; i < samples.size(); ++i)
+            samples[i] = static_cast<float>(std::sin(static_cast<double>(i) * 0.01));
+        for (int i = 0; i < kFiles; ++i) {
+            const std::string path = folder.path() / ("sample" + std::to_string(i) + ".wav");
+            made.emplace_back(path.c_str(), false);
+            CAudioFileIO out;
+            out.CreateAndOpenCommon(made.back(), 0, kAudioBusUndefined, 1 + i % 2, 16, 44100, kWAVE, false);
+            out.WriteFrames(samples.data(), 0, kFrames);
+            out.Close();
+        }
+        return made;
+    }();
+    return files;
+}
+
+void RegisterFiles(benchmark::State& state)
+{
+    const std::vector<CFileRef>& files = sampleFiles();
+    for (auto _ : state) {
+        CFileServer server(kFiles);
+        for (const CFileRef& file : files)
+            if (server.Register(1, &file) != 1)
+                return state.SkipWithError("a file was not registered");
+    }
+    state.SetItemsProcessed(state.iterations() * kFiles);
+}
+BENCHMARK(RegisterFiles)->Unit(benchmark::kMillisecond)->UseRealTime();
+
+void RegisterFilesWithSndfile(benchmark::State& state)
+{
+    const std::vector<CFileRef>& files = sampleFiles();
+    for (auto _ : state) {
+        std::vector<std::unique_ptr<float[]>> kept;
+        for (const CFileRef& file : files) {
+            SF_INFO info = {};
+            SNDFILE* const opened = sf_open(file.GetPath(), SFM_READ, &info);
+            kept.emplace_back(new float[static_cast<std::size_t>(info.frames * info.channels)]);
+            const sf_count_t read = sf_readf_float(opened, kept.back().get(), info.frames);
+            sf_close(opened);
+            if (read != kFrames)
+                return state.SkipWithError("a file was not read");
+        }
+    }
+    state.SetItemsProcessed(state.iterations() * kFiles);
+}
+BENCHMARK(RegisterFilesWithSndfile)->Unit(benchmark::kMillisecond)->UseRealTime();
+
+void RegisterFurtherClient(benchmark::State& state)
+{
+    const CFileRef& file = sampleFiles().front();
+    CFileServer server(kFiles);
+    server.Register(1, &file);
+    server.Register(2, &file);
+    for (auto _ : state)
+        benchmark::DoNotOptimize(server.Register(2, &file));
+}
+BENCHMARK(RegisterFurtherClient);
+
+/// What a further client cannot be spared: whether the file is still there.
+void StatusOfTheFile(benchmark::State& state)
+{
+    const char* path = sampleFiles().front().GetPath();
+    platform::FileStatus status;
+    for (auto _ : state)
+        benchmark::DoNotOptimize(platform::systemCalls().pathStatus(path, &status));
+}
+BENCHMARK(StatusOfTheFile);
+
+} // namespace

@@ -1,0 +1,14 @@
+// How much memory there is.
+#pragma once
+
+#include "platform/core/Export.h"
+
+#include <cstdint>
+
+namespace platform {
+
+/// Bytes that the process could take now without the system having to write other memory to disk; the largest number
+/// where the system does not tell.
+KT_EXPORT std::uint64_t availableMemory();
+
+} // namespace platform

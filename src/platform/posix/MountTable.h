@@ -1,0 +1,22 @@
+// The mounts of this process, as the kernel lists them.
+#pragma once
+
+#include <cstdint>
+#include <optional>
+#include <string>
+#include <string_view>
+
+namespace platform {
+
+struct Mount {
+    std::uint64_t id = 0;
+    std::string folder; // where it is mounted
+    std::string fileSystem;
+};
+
+/// One line of /proc/self/mountinfo; null for anything else.
+std::optional<Mount> mountFromLine(std::string_view line);
+/// The mount that the item at a path lies on; null when it is not known.
+std::optional<Mount> mountOf(const char* path);
+
+} // namespace platform

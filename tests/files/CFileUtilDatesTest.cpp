@@ -1,0 +1,154 @@
+#include "files/CFileUtilDates.h"
+#include "platform/FileDates.h"
+#include "platform/core/Status.h"
+
+#include "support/TemporaryFolder.h"
+
+#include <gtest/gtest.h>
+
+#include <cmath>
+#include <cstdlib>
+#include <limits>
+
+namespace {
+
+/// The local time zone, until it goes out of scope.
+class TimeZone {
+public:
+    explicit TimeZone(const char* zone)
+    {
+        if (const char* current = std::getenv("TZ"))
+            before_ = current;
+        ::setenv("TZ", zone, 1);
+    }
+    ~TimeZone()
+    {
+        if (before_)
+            ::setenv("TZ", before_->c_str(), 1);
+        else
+            ::unsetenv("TZ");
+    }
+    TimeZone(const TimeZone&) = delete;
+    TimeZone& operator=(const TimeZone&) = delete;
+
+private:
+    std::optional<std::string> before_;
+};
+
+constexpr std::int64_t kWinter = 1'705'320'000; // 2024-01-15 12:00:00 UTC
+constexpr std::int64_t kSummer = 1'721'044'800; // 2024-07-15 12:00:00 UTC
+constexpr double k1904 = -3'061'152'000;        // since 2001
+
+} // namespace
+
+TEST(Dates, TheModificationDateBothWays)
+{
+    const TemporaryFolder folder;
+    const std::string path = folder.write("file", "x");
+    const CFileRef file(path.c_str(), false);
+    for (const double seconds : {10.0, 0.0, 725'000'000.25, -10.5, k1904}) {
+        SCOPED_TRACE(seconds);
+        EXPECT_EQ(CFileUtilSetUTCModDate(file, seconds), 0);
+        EXPECT_EQ(CFileUtilUTCModDate(file), seconds);
+        EXPECT_EQ(CFileUtilGetModificationDate(file), platform::Date{seconds});
+    }
+    // The command "stat" is another reader: ten seconds into 2001.
+    ASSERT_EQ(CFileUtilSetModificationDate(file, {10}), 0);
+    EXPECT_EQ(platform::fileDate(path.c_str(), platform::FileDate::modification), (platform::FileTime{978'307'210, 0}));
+    for (const double none : {std::nan(""), std::numeric_limits<double>::infinity(), 1e300, -1e300})
+        EXPECT_EQ(CFileUtilSetUTCModDate(file, none), kStatusParameterError);
+    EXPECT_EQ(CFileUtilUTCModDate(file), 10);
+
+    std::filesystem::create_symlink("file", folder / "link");
+    EXPECT_EQ(CFileUtilUTCModDate(CFileRef((folder / "link").c_str(), false)), 10);
+}
+
+TEST(Dates, OfOldCatalogsAreInLocalTime)
+{
+    const TemporaryFolder folder;
+    const CFileRef file(folder.write("file", "x").c_str(), false);
+    struct Case {
+        const char* zone; // its offset is the same all year
+        std::int64_t offset;
+    };
+    const Case cases[] = {
+        {"EAST-1", 3600}, {"UTC", 0}, {"Asia/Kolkata", 19'800}, {"Asia/Kathmandu", 20'700}, {"WEST+9:30", -34'200},
+    };
+    for (const Case& each : cases) {
+        SCOPED_TRACE(each.zone);
+        const TimeZone zone(each.zone);
+        ASSERT_EQ(CFileUtilSetUTCModDate(file, k1904), 0);
+        EXPECT_EQ(CFileUtilModDate(file), static_cast<unsigned int>(each.offset));
+        EXPECT_EQ(CFileUtilSetModDate(file, 0x80000000), 0);
+        EXPECT_EQ(CFileUtilUTCModDate(file), k1904 + 0x80000000 - static_cast<double>(each.offset));
+        EXPECT_EQ(CFileUtilModDate(file), 0x80000000);
+        CFileUtilSetUTCModDate(file, k1904 + 4294967296.0 + 5); // the 33rd bit is lost
+        EXPECT_EQ(CFileUtilModDate(file), static_cast<unsigned int>(each.offset + 5));
+    }
+}
+
+TEST(Dates, TheLocalOffsetKnowsDaylightSaving)
+{
+    struct Case {
+        const char* zone;
+        std::int64_t winter, summer; // on the northern half
+    };
+    const Case cases[] = {
+        {"Europe/Berlin", 3600, 7200},
+        {"America/New_York", -18'000, -14'400},
+        {"Australia/Lord_Howe", 39'600, 37'800}, // half an hour, in the other half of the year
+        {"Asia/Kolkata", 19'800, 19'800},
+    };
+    for (const Case& each : cases) {
+        SCOPED_TRACE(each.zone);
+        const TimeZone zone(each.zone);
+        EXPECT_EQ(platform::localOffsetFromUTC(kWinter), each.winter);
+        EXPECT_EQ(platform::localOffsetFromUTC(kSummer), each.summer);
+    }
+    const TimeZone zone("Europe/Berlin");
+    constexpr std::int64_t change = 1'711'846'800; // 2024-03-31 01:00:00 UTC
+    EXPECT_EQ(platform::localOffsetFromUTC(change - 1), 3600);
+    EXPECT_EQ(platform::localOffsetFromUTC(change), 7200);
+
+    // The date of a file from the other half of the year is shifted by the offset of today all the same.
+    const TemporaryFolder folder;
+    const CFileRef file(folder.write("file", "x").c_str(), false);
+    const std::int64_t today = platform::localOffsetFromUTC(platform::currentTime());
+    for (const std::int64_t time : {kWinter, kSummer}) {
+        ASSERT_EQ(CFileUtilSetUTCModDate(file, static_cast<double>(time - 978'307'200)), 0);
+        EXPECT_EQ(CFileUtilModDate(file), static_cast<unsigned int>(time + 2'082'844'800 + today));
+    }
+}
+
+TEST(Dates, WhatCannotBeHad)
+{
+    const TemporaryFolder folder;
+    const CFileRef file(folder.write("file", "x").c_str(), false);
+    const CFileRef missing((folder / "missing").c_str(), false);
+    EXPECT_EQ(CFileUtilUTCModDate(missing), 0);
+    EXPECT_EQ(CFileUtilModDate(missing), 0U);
+    EXPECT_EQ(CFileUtilGetModificationDate(missing), std::nullopt);
+    EXPECT_EQ(CFileUtilGetCreationDate(missing), std::nullopt);
+    EXPECT_EQ(CFileUtilSetUTCModDate(missing, 0), kStatusFileNotFound);
+    EXPECT_EQ(CFileUtilSetModDate(missing, 0), kStatusIOError);
+    EXPECT_EQ(CFileUtilSetModDate(CFileRef::None, 0), kStatusIOError);
+    EXPECT_EQ(CFileUtilBumpDate(missing), kStatusFileNotFound);
+    EXPECT_EQ(CFileUtilBumpDate(CFileRef::None), kStatusParameterError);
+    EXPECT_EQ(CFileUtilSetCreationDate(missing, {0}), kStatusFileNotFound);
+    EXPECT_EQ(CFileUtilSetCreationDate(file, {0}), kStatusIOError);
+}
+
+TEST(Dates, BumpIsNow)
+{
+    const TemporaryFolder folder;
+    const CFileRef file(folder.write("file", "x").c_str(), false);
+    ASSERT_EQ(CFileUtilSetUTCModDate(file, 0), 0);
+    const double before = static_cast<double>(platform::currentTime() - 978'307'200);
+    EXPECT_EQ(CFileUtilBumpDate(file), 0);
+    EXPECT_GE(CFileUtilUTCModDate(file), before - 1);
+    EXPECT_LE(CFileUtilUTCModDate(file), before + 60);
+    // A file that was just made was created about now, where its file system keeps that.
+    if (const auto created = CFileUtilGetCreationDate(file); created && created->secondsSince2001 > 0) {
+        EXPECT_NEAR(created->secondsSince2001, before, 60);
+    }
+}

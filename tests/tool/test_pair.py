@@ -1,0 +1,80 @@
+"""ktfiles pair, and what ktfiles info says of names, dates and stereo partners."""
+import json
+import os
+import unittest
+
+from command import CommandTest, wave
+
+
+class Pair(CommandTest):
+    def write_all(self, *names):
+        for name in names:
+            (self.folder / name).parent.mkdir(parents=True, exist_ok=True)
+            self.write(name, wave())
+
+    def test_pairs_and_halves_of_a_folder(self):
+        self.write_all("in/Bass.L.wav", "in/Bass.R.wav", "in/Kick.wal", "in/below/Old.air", "in/mono.wav", "in/x.L.mp4",
+                       "in/Loud.L.AIF", "in/Loud.R.aif", "in/TUBA.L.WAV", "in/TUBA.R.WAV")
+        expected = [
+            "in/Bass.L.wav\tin/Bass.R.wav\tpair",
+            "in/Kick.wal\tin/Kick.war\tright missing",
+            "in/Loud.L.AIF\tin/Loud.R.aif\tpair",
+            "in/TUBA.L.WAV\tin/TUBA.R.WAV\tpair",
+            "in/below/Old.ail\tin/below/Old.air\tleft missing",
+        ]
+        self.assertEqual(self.lines("pair", "in"), expected)
+        self.assertEqual(self.json("pair", "in")[1], {"left": "in/Kick.wal", "right": "in/Kick.war",
+                                                      "leftExists": True, "rightExists": False})
+        text, status = self.on_terminal("pair", "in", NO_COLOR="1")
+        self.assertEqual(status, 0)
+        self.assertEqual(text.splitlines()[:2], ["LEFT              RIGHT             STATE",
+                                                 "in/Bass.L.wav     in/Bass.R.wav     pair"])
+        self.assertEqual(self.lines("pair", "in", "--quiet"), [])
+
+    def test_files_that_are_named(self):
+        self.write_all("a.L.wav", "a.R.wav", "mono.wav", "b.L.wav")
+        os.mkdir(self.folder / "b.R.wav")  # no partner
+        self.assertEqual(self.lines("pair", "a.R.wav", "a.L.wav", "mono.wav", "b.L.wav"),
+                         ["a.L.wav\ta.R.wav\tpair", "b.L.wav\tb.R.wav\tright missing"])
+        self.assertEqual(self.json("pair", "mono.wav"), [])
+        self.assertIn("missing.L.wav: file not found", self.failure("pair", "missing.L.wav", "a.L.wav"))
+        self.failure("pair", status=2)
+
+    def test_names_that_are_not_utf8(self):
+        folder = os.fsencode(self.folder)
+        for name in (b"\xff.L.wav", b"\xff.R.wav"):
+            with open(os.path.join(folder, name), "wb") as out:
+                out.write(wave())
+        self.assertTrue(self.lines("pair", ".")[0].endswith("\tpair"))
+
+
+class LongInfo(CommandTest):
+    def setUp(self):
+        super().setUp()
+        for name in ("Bass.L.wav", "Bass.R.wav", "alone.war", "named.mid"):
+            path = self.write(name, wave())
+            os.utime(path, (0, 1705320000))  # 2024-01-15 12:00:00 UTC
+
+    def test_lines(self):
+        lines = self.lines("info", "--long", "Bass.L.wav", "alone.war", "named.mid")
+        self.assertEqual([line.split("\t")[6:] for line in lines], [
+            ["WAVE", "2024-01-15T12:00:00Z", "Bass.R.wav", "there"],
+            ["WAVE", "2024-01-15T12:00:00Z", "alone.wal", "missing"],
+            ["Midi", "2024-01-15T12:00:00Z", "", ""]])
+
+    def test_json_has_them_always(self):
+        stereo, plain = self.json("info", "Bass.R.wav", "named.mid")
+        self.assertEqual((stereo["typeByName"], stereo["modified"], stereo["stereoPartner"],
+                          stereo["stereoPartnerExists"]), ("WAVE", "2024-01-15T12:00:00Z", "Bass.L.wav", True))
+        self.assertEqual((plain["typeByName"], plain["fileType"]), ("Midi", "WAVE"))
+        self.assertNotIn("stereoPartner", plain)
+
+    def test_the_table_is_in_local_time(self):
+        text, _ = self.on_terminal("info", "-l", "alone.war", NO_COLOR="1", TZ="Asia/Kolkata")
+        title, row = text.splitlines()
+        self.assertTrue(title.endswith("CHANNELS  BY NAME  MODIFIED          STEREO PARTNER"), title)
+        self.assertTrue(row.endswith("mono      WAVE     2024-01-15 17:30  alone.wal (missing)"), row)
+
+
+if __name__ == "__main__":
+    unittest.main()

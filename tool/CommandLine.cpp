@@ -99,7 +99,7 @@ std::map<int, void (*)(CommandLine&)>& registeredVerbs()
 std::string usageMessage(const CLI::ParseError& error)
 {
     std::string message = printable(error.what());
-    for (const char* const prefix : {"FILE: ", "ID: ", "FROM: ", "TO: ", "FOLDER: "})
+    for (const char* const prefix : {"FILE: ", "ID: ", "FROM: ", "TO: ", "FOLDER: ", "PACKAGE: "})
         if (message.starts_with(prefix))
             message.erase(0, std::string_view(prefix).size());
     return message;

@@ -8,6 +8,7 @@ _ktfiles()
     local common='--json --quiet --color --help' edit='--in-place --dry-run --backup'
     local keys='beatCount midiRootNote keyType signatureTop signatureBottom loopFileType instrumentType
         instrumentSubType genre descriptors title artist copyright comments transients key mode signature'
+    local projects='media dirs backup restore rename-alternative'
     local verb=${words[1]} object=${words[2]}
 
     case $prev in
@@ -15,18 +16,20 @@ _ktfiles()
         --from | -o | --output | --png | --svg) _filedir; return ;;
         --sidecar) return ;;
         --colors) COMPREPLY=($(compgen -W 'night day amber rose ink' -- "$cur")); return ;;
-        --width | --height | --start | --end) return ;;
+        --width | --height | --start | --end | --alternative | --keep) return ;;
     esac
 
     if ((cword == 1)); then
-        COMPREPLY=($(compgen -W 'info pair chunks tags scan overview adm help --help --version' -- "$cur"))
+        COMPREPLY=($(compgen -W 'info pair chunks tags scan overview adm project help --help --version' -- "$cur"))
     elif [[ $verb == help ]]; then
         if ((cword == 2)); then
-            COMPREPLY=($(compgen -W 'info pair chunks tags scan overview adm' -- "$cur"))
+            COMPREPLY=($(compgen -W 'info pair chunks tags scan overview adm project' -- "$cur"))
         elif ((cword == 3)) && [[ $object == chunks ]]; then
             COMPREPLY=($(compgen -W 'get add remove' -- "$cur"))
         elif ((cword == 3)) && [[ $object == tags ]]; then
             COMPREPLY=($(compgen -W 'set remove copy' -- "$cur"))
+        elif ((cword == 3)) && [[ $object == project ]]; then
+            COMPREPLY=($(compgen -W "$projects" -- "$cur"))
         fi
     elif [[ $cur == -* ]]; then
         case $verb/$object in
@@ -39,6 +42,11 @@ _ktfiles()
             overview/*) COMPREPLY=($(compgen -W "--png --svg --width --height --start --end --scale --colors --stored
                 --store $edit $common" -- "$cur")) ;;
             scan/*) COMPREPLY=($(compgen -W "--csv --threads $common" -- "$cur")) ;;
+            project/media) COMPREPLY=($(compgen -W "--missing --alternative $common" -- "$cur")) ;;
+            project/dirs) COMPREPLY=($(compgen -W "--create --alternative $common" -- "$cur")) ;;
+            project/backup) COMPREPLY=($(compgen -W "--keep --alternative --dry-run $common" -- "$cur")) ;;
+            project/restore) COMPREPLY=($(compgen -W "--alternative --dry-run $common" -- "$cur")) ;;
+            project/rename-alternative) COMPREPLY=($(compgen -W "$edit $common" -- "$cur")) ;;
             *) COMPREPLY=($(compgen -W "$common" -- "$cur")) ;;
         esac
     elif [[ $verb == chunks && $object == @(get|add|remove) ]] && ((cword == 4)) && [[ $prev != -* ]]; then
@@ -50,6 +58,9 @@ _ktfiles()
         done
     elif [[ $verb == scan ]]; then
         _filedir -d
+    elif [[ $verb == project ]]; then
+        _filedir -d
+        ((cword == 2)) && COMPREPLY+=($(compgen -W "$projects" -- "$cur"))
     else
         _filedir
         if ((cword > 3)) && [[ $verb/$object == tags/set ]]; then

@@ -37,6 +37,8 @@ struct SystemCalls {
     std::int64_t (*pwrite)(int descriptor, const void* buffer, std::size_t count, std::int64_t offset);
     int (*ftruncate)(int descriptor, std::int64_t length);
     int (*fsync)(int descriptor);
+    /// Commits the names in a folder to storage; success where the file system keeps no such promise.
+    int (*syncFolder)(const char* path);
     /// Reserves space behind the physical end of the file without changing its length.
     int (*preallocate)(int descriptor, std::int64_t offset, std::int64_t length);
     /// A hint that what is read will not be read again soon; never makes repeated reads slow.
@@ -44,6 +46,16 @@ struct SystemCalls {
     bool (*status)(int descriptor, FileStatus* status);
     bool (*pathStatus)(const char* path, FileStatus* status); // follows links
     bool (*linkStatus)(const char* path, FileStatus* status); // does not
+
+    // Names. A symbolic link at the end of a path is the item itself.
+    int (*createFolder)(const char* path, std::uint32_t permissions);
+    /// Fails with EEXIST when something has the name `to`; with EXDEV on another file system.
+    int (*renameWithoutReplacing)(const char* from, const char* to);
+    /// Two items that exist take each other's names, in one step that is never half done. EINVAL or ENOSYS where the
+    /// file system cannot.
+    int (*exchangeNames)(const char* a, const char* b);
+    int (*removeFile)(const char* path);
+    int (*removeFolder)(const char* path); // an empty one
 };
 
 /// The calls in force in this process. Only tests assign to it.

@@ -32,6 +32,12 @@ enum class Call {
     ftruncate,
     fsync,
     preallocate,
+    syncFolder,
+    createFolder,
+    renameWithoutReplacing,
+    exchangeNames,
+    removeFile,
+    removeFolder,
     count
 };
 
@@ -49,6 +55,12 @@ public:
         calls.ftruncate = intercept<Call::ftruncate, &SystemCalls::ftruncate>;
         calls.fsync = intercept<Call::fsync, &SystemCalls::fsync>;
         calls.preallocate = intercept<Call::preallocate, &SystemCalls::preallocate>;
+        calls.syncFolder = intercept<Call::syncFolder, &SystemCalls::syncFolder>;
+        calls.createFolder = intercept<Call::createFolder, &SystemCalls::createFolder>;
+        calls.renameWithoutReplacing = intercept<Call::renameWithoutReplacing, &SystemCalls::renameWithoutReplacing>;
+        calls.exchangeNames = intercept<Call::exchangeNames, &SystemCalls::exchangeNames>;
+        calls.removeFile = intercept<Call::removeFile, &SystemCalls::removeFile>;
+        calls.removeFolder = intercept<Call::removeFolder, &SystemCalls::removeFolder>;
         calls.pread = transfer<Call::pread, &SystemCalls::pread>;
         calls.pwrite = transfer<Call::pwrite, &SystemCalls::pwrite>;
         // Like the system's, a close that fails has closed.

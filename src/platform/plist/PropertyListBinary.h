@@ -8,6 +8,7 @@
 
 #include <array>
 #include <cstdint>
+#include <cstring>
 #include <string>
 #include <string_view>
 
@@ -50,6 +51,24 @@ constexpr std::uint64_t unfoldingBudget(std::uint64_t bytes)
 /// What one value costs, its text and data not counted; in a dictionary, with its share of the tree.
 inline constexpr std::uint64_t kElementCost = sizeof(Value);
 inline constexpr std::uint64_t kEntryCost = sizeof(Value) + sizeof(std::string) + 64;
+
+/// Eight bytes at a time; the last ones once more where they do not fill eight.
+inline bool isASCII(std::string_view text)
+{
+    constexpr std::uint64_t highBits = 0x8080808080808080;
+    std::uint64_t together = 0, word = 0;
+    for (std::size_t i = 0; i + sizeof word <= text.size(); i += sizeof word) {
+        std::memcpy(&word, text.data() + i, sizeof word);
+        together |= word;
+    }
+    if (text.size() >= sizeof word) {
+        std::memcpy(&word, text.data() + text.size() - sizeof word, sizeof word);
+    } else {
+        word = 0;
+        std::memcpy(&word, text.data(), text.size());
+    }
+    return ((together | word) & highBits) == 0;
+}
 
 /// False, with `problem`, when the bytes are not whole and sound.
 bool readBinary(BytesView bytes, Value& value, std::string& problem);

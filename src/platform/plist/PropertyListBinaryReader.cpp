@@ -182,7 +182,7 @@ bool Reader::readCounted(BinaryKind kind, std::uint64_t count, ByteReader& in, V
         value = Bytes(content.begin(), content.end());
         return true;
     }
-    if (std::any_of(content.begin(), content.end(), [](std::byte byte) { return byte >= std::byte{0x80}; }))
+    if (!isASCII(textOf(content)))
         return fail("a text is not ASCII");
     value = std::string(textOf(content));
     return true;
@@ -218,16 +218,15 @@ bool Reader::readDictionary(BytesView references, int depth, Value& value)
     Dictionary dictionary;
     for (std::size_t i = 0; i < count; ++i) {
         Value key;
-        Value content;
         if (!readObject(reference(references, i), depth + 1, key))
             return false;
         auto* text = key.get<std::string>();
         if (text == nullptr)
             return fail("a key is not a text");
-        if (!readObject(reference(references, count + i), depth + 1, content))
+        // Most writers sort the keys: then each belongs at the end. Of two equal ones the last is read over the first.
+        const auto entry = dictionary.try_emplace(dictionary.end(), std::move(*text));
+        if (!readObject(reference(references, count + i), depth + 1, entry->second))
             return false;
-        // Most writers sort the keys: then each belongs at the end.
-        dictionary.insert_or_assign(dictionary.end(), std::move(*text), std::move(content));
     }
     value = std::move(dictionary);
     return true;

@@ -5,8 +5,8 @@
 
 #include <algorithm>
 #include <cstring>
+#include <functional>
 #include <limits>
-#include <unordered_map>
 
 namespace platform::plist {
 
@@ -51,9 +51,17 @@ private:
         std::size_t firstReference = 0;
     };
 
+    /// Of a table that finds the object of a text without an allocation for each.
+    struct Slot {
+        std::uint64_t hash = 0;
+        std::uint64_t number = 0; // of the object, from 1; 0 for a free slot
+    };
+
     bool number(const Value& value, int depth, std::uint64_t& index);
     bool numberContainer(const Value& value, int depth, std::uint64_t object);
     bool numberText(const std::string& text, std::uint64_t& index);
+    Slot& slotOf(const std::string& text);
+    void growSlots();
     bool mayShare(const std::string& text);
 
     bool writeObject(const Object& object);
@@ -73,7 +81,8 @@ private:
     std::vector<Object> objects_;
     std::vector<std::uint64_t> references_;
     std::vector<std::uint64_t> offsets_;
-    std::unordered_map<std::string_view, std::uint64_t> texts_;
+    std::vector<Slot> slots_;       // a power of two, at most half of them taken
+    std::size_t textCount_ = 0;     // different ones
     std::uint64_t leastSize_ = 0;   // the file will have at least so many bytes
     std::uint64_t sharedBytes_ = 0; // of texts, beyond their first use
     unsigned referenceExponent_ = 0;
@@ -86,6 +95,8 @@ bool Writer::write(const Value& value, Bytes& bytes)
     if (!number(value, 0, top))
         return false;
     referenceExponent_ = widthExponent(objects_.size() - 1);
+    out_.reserve(2 * leastSize_ + references_.size() * 4 + objects_.size() * 4);
+    offsets_.reserve(objects_.size());
     out_.write(bytesOf(kBinaryHeader));
     for (const Object& object : objects_) {
         offsets_.push_back(out_.size());
@@ -147,15 +158,48 @@ bool Writer::numberContainer(const Value& value, int depth, std::uint64_t object
 
 bool Writer::numberText(const std::string& text, std::uint64_t& index)
 {
-    const auto [known, isNew] = texts_.try_emplace(text, objects_.size());
+    Slot& slot = slotOf(text);
+    const bool isNew = slot.number == 0;
     if (!isNew && mayShare(text)) {
-        index = known->second;
+        index = slot.number - 1;
         return true;
     }
-    index = known->second = objects_.size();
+    textCount_ += isNew ? 1 : 0;
+    index = objects_.size();
+    slot.number = index + 1;
     objects_.push_back({nullptr, &text, 0});
     leastSize_ += 1 + text.size() / 2; // 16-bit units take at least half as many bytes as UTF-8
     return true;
+}
+
+/// The slot of the text, or a free one that knows its hash.
+Writer::Slot& Writer::slotOf(const std::string& text)
+{
+    if (2 * (textCount_ + 1) > slots_.size())
+        growSlots();
+    const std::uint64_t hash = std::hash<std::string>()(text);
+    for (std::size_t i = hash;; ++i) {
+        Slot& slot = slots_[i & (slots_.size() - 1)];
+        if (slot.number == 0)
+            slot.hash = hash;
+        if (slot.number == 0 || (slot.hash == hash && *objects_[slot.number - 1].text == text))
+            return slot;
+    }
+}
+
+void Writer::growSlots()
+{
+    constexpr std::size_t kFirstSlots = 64;
+    std::vector<Slot> larger(std::max(kFirstSlots, 4 * slots_.size()));
+    for (const Slot& slot : slots_) {
+        if (slot.number == 0)
+            continue;
+        std::size_t i = slot.hash;
+        while (larger[i & (larger.size() - 1)].number != 0)
+            ++i;
+        larger[i & (larger.size() - 1)] = slot;
+    }
+    slots_ = std::move(larger);
 }
 
 /// Readers refuse a list whose values unfold to far more than its size, so a long text that is used very often is
@@ -220,8 +264,7 @@ void Writer::writeInteger(std::int64_t integer)
 
 bool Writer::writeText(const std::string& text)
 {
-    const bool isASCII = std::all_of(text.begin(), text.end(), [](unsigned char c) { return c < 0x80; });
-    if (isASCII) {
+    if (isASCII(text)) {
         writeHead(BinaryKind::ascii, text.size());
         out_.write(bytesOf(text));
         return true;

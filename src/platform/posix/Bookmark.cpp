@@ -1,10 +1,10 @@
 #include "platform/Bookmark.h"
 
+#include "platform/SmallFile.h"
 #include "platform/core/ByteReader.h"
 #include "platform/core/ByteWriter.h"
 #include "platform/posix/AbsolutePath.h"
 #include "platform/posix/ItemSearch.h"
-#include "platform/posix/SmallFile.h"
 
 #include <cerrno>
 #include <climits>

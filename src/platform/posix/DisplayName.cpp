@@ -1,7 +1,7 @@
 #include "platform/FileSystem.h"
 
+#include "platform/SmallFile.h"
 #include "platform/posix/AbsolutePath.h"
-#include "platform/posix/SmallFile.h"
 
 #include <algorithm>
 #include <cstdlib>

@@ -2,7 +2,7 @@
 
 #include "platform/FileSystem.h"
 #include "platform/posix/MountTable.h"
-#include "platform/posix/SmallFile.h"
+#include "platform/SmallFile.h"
 
 #include <array>
 #include <cstdlib>

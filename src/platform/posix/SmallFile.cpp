@@ -1,4 +1,4 @@
-#include "platform/posix/SmallFile.h"
+#include "platform/SmallFile.h"
 
 #include "platform/SystemCalls.h"
 
@@ -32,6 +32,43 @@ std::optional<Bytes> readSmallFile(const char* path, std::size_t limit)
     }
     calls.close(descriptor);
     return complete ? std::optional(std::move(content)) : std::nullopt;
+}
+
+bool writeContent(int descriptor, BytesView content)
+{
+    const SystemCalls& calls = systemCalls();
+    const auto length = static_cast<std::int64_t>(content.size());
+    // Not every file system can reserve; that the disk is full, every one knows.
+    if (length > 0 && calls.preallocate(descriptor, 0, length) != 0 && (errno == ENOSPC || errno == EDQUOT))
+        return false;
+    std::size_t written = 0;
+    while (written < content.size()) {
+        const std::int64_t count = calls.pwrite(descriptor, content.data() + written, content.size() - written,
+                                                static_cast<std::int64_t>(written));
+        if (count > 0)
+            written += static_cast<std::size_t>(count);
+        else if (count == 0)
+            errno = EIO;
+        if (count == 0 || (count < 0 && errno != EINTR))
+            return false;
+    }
+    return calls.ftruncate(descriptor, length) == 0;
+}
+
+bool writeSmallFile(const char* path, BytesView content)
+{
+    const SystemCalls& calls = systemCalls();
+    int descriptor = calls.openFile(path, OpenFor::readingAndWriting, nullptr);
+    if (descriptor < 0 && errno == ENOENT)
+        descriptor = calls.createFile(path, 0666);
+    if (descriptor < 0)
+        return false;
+    const bool written = writeContent(descriptor, content);
+    const int reason = errno;
+    const bool closed = calls.close(descriptor) == 0;
+    if (!written)
+        errno = reason;
+    return written && closed;
 }
 
 } // namespace platform

@@ -1,6 +1,7 @@
 #include "platform/SystemCalls.h"
 
 #include <cerrno>
+#include <cstdio>
 #include <cstring>
 
 #include <fcntl.h>
@@ -134,6 +135,41 @@ int adviseNoReuse(int descriptor)
     return error == 0 ? 0 : -1;
 }
 
+int syncFolder(const char* path)
+{
+    const int descriptor = ::open(path, O_RDONLY | O_DIRECTORY | O_CLOEXEC);
+    if (descriptor < 0)
+        return errno == EACCES ? 0 : -1; // a folder that may be written but not read cannot be committed by itself
+    const int result = ::fsync(descriptor) == 0 || errno == EINVAL ? 0 : -1;
+    const int reason = errno;
+    ::close(descriptor);
+    errno = reason;
+    return result;
+}
+
+int createFolder(const char* path, std::uint32_t permissions)
+{
+    return ::mkdir(path, static_cast<mode_t>(permissions));
+}
+
+int renameWithoutReplacing(const char* from, const char* to)
+{
+    if (::renameat2(AT_FDCWD, from, AT_FDCWD, to, RENAME_NOREPLACE) == 0)
+        return 0;
+    if (errno != EINVAL && errno != ENOSYS)
+        return -1;
+    // A file system without that flag: a look ahead leaves a moment in which another process can take the name.
+    struct stat found = {};
+    if (::lstat(to, &found) == 0)
+        errno = EEXIST;
+    return errno == ENOENT ? ::rename(from, to) : -1;
+}
+
+int exchangeNames(const char* a, const char* b)
+{
+    return ::renameat2(AT_FDCWD, a, AT_FDCWD, b, RENAME_EXCHANGE);
+}
+
 static_assert(sizeof(off_t) == 8, "file offsets are 64-bit");
 
 } // namespace
@@ -149,11 +185,17 @@ SystemCalls& systemCalls()
         .pwrite = ::pwrite,
         .ftruncate = ::ftruncate,
         .fsync = ::fsync,
+        .syncFolder = syncFolder,
         .preallocate = preallocate,
         .adviseNoReuse = adviseNoReuse,
         .status = descriptorStatus,
         .pathStatus = pathStatus,
         .linkStatus = linkStatus,
+        .createFolder = createFolder,
+        .renameWithoutReplacing = renameWithoutReplacing,
+        .exchangeNames = exchangeNames,
+        .removeFile = ::unlink,
+        .removeFolder = ::rmdir,
     };
     return calls;
 }

@@ -1,0 +1,145 @@
+#include "PackageOnDisk.h"
+#include "platform/Log.h"
+#include "support/FaultInjection.h"
+
+namespace fs = std::filesystem;
+
+namespace {
+
+using namespace platform;
+using Info = ProjectInformation;
+constexpr auto no = CreateDirectories::no;
+constexpr auto yes = CreateDirectories::yes;
+
+class Backups {
+public:
+    /// Names, oldest first; equal times where `sameTime`.
+    explicit Backups(const std::vector<std::string>& names, bool sameTime = false)
+    {
+        const auto start = fs::file_time_type::clock::now() - std::chrono::hours(1);
+        int number = 0;
+        for (const std::string& name : names) {
+            package_.write(item(name) + "/ProjectData", name);
+            package_.write(item(name) + "/ARA Files/deep/er", name);
+            fs::last_write_time(package_ / (item(name) + "/ProjectData"),
+                                start + std::chrono::seconds(sameTime ? 0 : number++));
+        }
+    }
+    static std::string item(const std::string& name) { return "Alternatives/000/Project File Backups/" + name; }
+    std::string path(const std::string& name) const { return package_ / item(name); }
+
+    std::vector<std::string> names() const
+    {
+        std::vector<std::string> names;
+        for (const ProjectBackup& backup : Info::backupsForBundleURL(package_.url(), 0))
+            names.push_back(fs::path(backup.url->posixPath()).filename());
+        return names;
+    }
+    std::string next(int most, PurgeOldBackups purge, CreateDirectories create = no) const
+    {
+        const URLRef url = Info::urlForNewBackupForBundleURL(package_.url(), 0, create, most, purge);
+        return url ? fs::path(url->posixPath()).filename().string() : "none";
+    }
+    const PackageOnDisk& package() const { return package_; }
+
+private:
+    PackageOnDisk package_;
+};
+
+using Names = std::vector<std::string>;
+
+TEST(ProjectBackups, ListedByDateThenName)
+{
+    EXPECT_EQ(Backups({"02", "00", "10"}).names(), (Names{"02", "00", "10"}));
+    const Backups backups({"b", "10", "a", "02"}, true);
+    backups.package().write(Backups::item(".hidden") + "/ProjectData", std::string_view());
+    backups.package().write(Backups::item("empty") + "/MetaData.plist", std::string_view());
+    backups.package().write(Backups::item("file"), std::string_view());
+    fs::create_symlink("circle", backups.path("circle"));
+    EXPECT_EQ(backups.names(), (Names{"02", "10", "a", "b"}));
+    EXPECT_TRUE(Info::backupsForBundleURL(backups.package().url(), 1).empty());
+    EXPECT_TRUE(Info::backupsForBundleURL(backups.package().url(), -1).empty());
+    EXPECT_TRUE(Info::backupsForBundleURL(nullptr, 0).empty());
+    const auto date = Info::modificationDateForVariantIndex(0, backups.package().url());
+    EXPECT_EQ(date, std::nullopt); // no project data of its own
+}
+
+TEST(ProjectBackups, NewNames)
+{
+    constexpr auto keep = PurgeOldBackups::no, purge = PurgeOldBackups::yes;
+    const struct {
+        Names there;
+        int most;
+        PurgeOldBackups purges;
+        const char* name;
+        Names left;
+    } cases[] = {
+        {{}, 3, keep, "00", {}},
+        {{"00", "01"}, 3, keep, "02", {"00", "01"}},
+        {{"02", "01"}, 3, keep, "00", {"02", "01"}}, // counting up comes round
+        {{"00", "02"}, 4, keep, "03", {"00", "02"}}, // 2 is taken
+        {{"00", "01", "02"}, 3, keep, "none", {"00", "01", "02"}},
+        {{"00", "01", "02"}, 3, purge, "00", {"01", "02"}},
+        {{"01", "02", "00"}, 3, purge, "01", {"02", "00"}}, // the oldest goes
+        {{"00", "01", "02", "03"}, 2, purge, "01", {"03"}}, // as many as are too many
+        {{"00"}, 1, purge, "00", {}},
+        {{"00"}, 0, purge, "none", {"00"}},
+        {{"00"}, -5, purge, "none", {"00"}},
+        {{"00"}, 2147483647, purge, "01", {"00"}},
+        {{"mine", "00"}, 3, keep, "02", {"mine", "00"}},
+    };
+    for (const auto& test : cases) {
+        const Backups backups(test.there);
+        EXPECT_EQ(backups.next(test.most, test.purges), test.name);
+        EXPECT_EQ(backups.names(), test.left);
+        EXPECT_TRUE(std::string_view(test.name) == "none" || !fs::exists(backups.path(test.name)));
+    }
+}
+
+TEST(ProjectBackups, NewFolders)
+{
+    const Backups backups({"00"});
+    EXPECT_EQ(backups.next(5, PurgeOldBackups::no, yes), "01");
+    EXPECT_TRUE(fs::is_directory(backups.path("01")));
+    EXPECT_EQ(backups.next(5, PurgeOldBackups::no, yes), "01"); // still empty: nobody's
+    backups.package().write(Backups::item("01") + "/half", std::string_view("a backup"));
+    EXPECT_EQ(backups.next(5, PurgeOldBackups::no), "02");
+    const PackageOnDisk fresh;
+    EXPECT_TRUE(Info::urlForNewBackupForBundleURL(fresh.url(), 3, yes, 5, PurgeOldBackups::no));
+    EXPECT_TRUE(fs::is_directory(fresh / "Alternatives/003/Project File Backups/00"));
+}
+
+TEST(ProjectBackups, ADeletionCutShortLeavesNoHalfBackup)
+{
+    const Backups backups({"00", "01"});
+    {
+        FaultInjector faults;
+        faults.fail(Call::removeFile, EIO);
+        EXPECT_EQ(backups.next(2, PurgeOldBackups::yes), "none");
+    }
+    EXPECT_EQ(backups.names(), Names{"01"});
+    EXPECT_TRUE(fs::exists(backups.path(".deleted-00"))); // hidden
+    backups.package().write(Backups::item("00") + "/ProjectData", std::string_view("newer"));
+    EXPECT_EQ(backups.next(1, PurgeOldBackups::yes), "00");
+    EXPECT_FALSE(fs::exists(backups.path(".deleted-00")));
+}
+
+TEST(ProjectBackups, OneOfAnInterruptedExchangeIsNotPurged)
+{
+    const Backups backups({"00", "01"});
+    backups.package().write("Alternatives/000/ProjectData", std::string_view("mine"));
+    {
+        FaultInjector faults;
+        faults.fail(Call::removeFile, EACCES, 2, 100);             // the record stays
+        faults.fail(Call::renameWithoutReplacing, EACCES, 3, 100); // nor is anything undone
+        faults.fail(Call::exchangeNames, EACCES, 2, 100);
+        EXPECT_FALSE(Info::exchangeDataOfProjectAtURL(backups.package().url(), 0, urlOf(backups.path("00"))));
+    }
+    const auto interrupted = Info::interruptedExchangeForBundleURL(backups.package().url(), 0);
+    ASSERT_TRUE(interrupted);
+    EXPECT_TRUE(interrupted->isComplete);
+    EXPECT_EQ(backups.next(2, PurgeOldBackups::yes), "01");
+    EXPECT_EQ(backups.names(), Names{"00"});
+}
+
+} // namespace

@@ -1,0 +1,338 @@
+// The exchange of an alternative's data with a backup's, cut short at every call that it makes.
+#include "PackageOnDisk.h"
+#include "platform/Log.h"
+#include "support/FaultInjection.h"
+
+#include <csignal>
+#include <functional>
+#include <map>
+#include <sys/wait.h>
+#include <unistd.h>
+
+namespace fs = std::filesystem;
+
+namespace {
+
+using namespace platform;
+using Info = ProjectInformation;
+using Tree = std::map<std::string, std::string>; // path -> content
+
+const char* const kAlternative = "Alternatives/000";
+const char* const kFirst = "Alternatives/000/Project File Backups/00";
+const char* const kSecond = "Alternatives/000/Project File Backups/01";
+
+Tree contentOf(const std::string& folder)
+{
+    Tree tree;
+    for (const auto& entry : fs::recursive_directory_iterator(folder))
+        if (entry.is_regular_file())
+            tree[fs::relative(entry.path(), folder)] = textOf(readFile(entry.path()));
+    return tree;
+}
+
+/// An alternative with all that takes part, a backup with less, and another backup.
+class Exchange {
+public:
+    Exchange()
+    {
+        for (const char* item :
+             {"ProjectData", "MetaData.plist", "MetaData.bak", "ARA Files/one", "Autosave/data", "WindowImage.jpg"})
+            package_.write(std::string(kAlternative) + '/' + item, std::string("mine: ") + item);
+        for (const char* item : {"ProjectData", "MetaData.plist", "ARA Files/two"})
+            package_.write(std::string(kFirst) + '/' + item, std::string("first: ") + item);
+        package_.write(std::string(kSecond) + "/ProjectData", std::string_view("second: ProjectData"));
+        before_ = now();
+        EXPECT_TRUE(exchange());
+        after_ = now();
+        EXPECT_TRUE(exchange());
+        EXPECT_EQ(now(), before_); // twice is as if never
+        EXPECT_NE(before_, after_);
+    }
+
+    bool exchange(const char* backup = kFirst, Error* error = nullptr) const
+    {
+        return Info::exchangeDataOfProjectAtURL(package_.url(), 0, urlOf(package_ / backup), error);
+    }
+    Tree now() const { return contentOf(package_.path()); }
+    const Tree& before() const { return before_; }
+    const Tree& after() const { return after_; }
+    const PackageOnDisk& package() const { return package_; }
+    auto interrupted() const { return Info::interruptedExchangeForBundleURL(package_.url(), 0); }
+
+    /// Wherever things are: each content once, and nothing else but the record.
+    void expectAllThere() const
+    {
+        std::multimap<std::string, int> expected, found;
+        for (const auto& [path, content] : before_)
+            expected.emplace(content, 0);
+        for (const auto& [path, content] : now())
+            if (path.find(".exchange.dummy") == path.npos)
+                found.emplace(content, 0);
+        EXPECT_EQ(found, expected);
+    }
+
+private:
+    PackageOnDisk package_;
+    Tree before_, after_;
+};
+
+int failExchange(const char*, const char*)
+{
+    errno = EINVAL;
+    return -1;
+}
+
+TEST(ProjectExchange, TakesEverythingWithIt)
+{
+    const Exchange exchange;
+    Tree expected;
+    const std::string mine = std::string(kAlternative) + '/', first = std::string(kFirst) + '/';
+    for (const char* item : {"ProjectData", "MetaData.plist", "MetaData.bak", "ARA Files/one", "Autosave/data"})
+        expected[first + item] = std::string("mine: ") + item;
+    for (const char* item : {"ProjectData", "MetaData.plist", "ARA Files/two"})
+        expected[mine + item] = std::string("first: ") + item;
+    expected[mine + "WindowImage.jpg"] = "mine: WindowImage.jpg";
+    expected[std::string(kSecond) + "/ProjectData"] = "second: ProjectData";
+    EXPECT_EQ(exchange.after(), expected);
+    EXPECT_FALSE(exchange.interrupted());
+}
+
+TEST(ProjectExchange, FileSystemsThatCannotExchangeNames)
+{
+    const SystemCallGuard guard;
+    systemCalls().exchangeNames = failExchange;
+    const Exchange exchange; // there and back
+    EXPECT_EQ(exchange.now(), exchange.before());
+}
+
+TEST(ProjectExchange, BackupsThatAreNone)
+{
+    const Exchange exchange;
+    exchange.package().write("Alternatives/000/Project File Backups/02/MetaData.plist", std::string_view("alone"));
+    const Tree before = exchange.now();
+    for (const char* backup : {"Alternatives/000/Project File Backups/02", "none", "Alternatives/000/ProjectData"}) {
+        Error error;
+        EXPECT_FALSE(exchange.exchange(backup, &error)) << backup;
+        EXPECT_EQ(error.description, "This backup is missing data and cannot not be restored.");
+        EXPECT_EQ(error.domain, kProjectErrorDomain);
+    }
+    Error error;
+    EXPECT_FALSE(Info::exchangeDataOfProjectAtURL(exchange.package().url(), 0, nullptr, &error));
+    EXPECT_EQ(error.domain, kProjectErrorDomain);
+    for (const long index : {1L, -1L, 1L << 40})
+        EXPECT_FALSE(Info::exchangeDataOfProjectAtURL(exchange.package().url(), index,
+                                                      urlOf(exchange.package() / kFirst), &error));
+    EXPECT_FALSE(Info::exchangeDataOfProjectAtURL(nullptr, 0, nullptr, &error));
+    EXPECT_EQ(exchange.now(), before);
+}
+
+/// Every call that changes something, with whether names can be exchanged in one step.
+using Step = std::tuple<Call, bool>;
+class ProjectExchangeFaults : public testing::TestWithParam<Step> {};
+
+TEST_P(ProjectExchangeFaults, OneFailureChangesNothing)
+{
+    const auto [call, canExchange] = GetParam();
+    for (const int error : {ENOSPC, EACCES})
+        for (int nth = 1;; ++nth) {
+            const Exchange exchange;
+            int calls = 0;
+            bool done = false;
+            {
+                FaultInjector faults;
+                if (!canExchange)
+                    systemCalls().exchangeNames = failExchange;
+                faults.fail(call, error, nth);
+                Error told;
+                done = exchange.exchange(kFirst, &told);
+                calls = faults.calls(call);
+                EXPECT_EQ(told.domain, done ? "" : ErrorDomain::system);
+            }
+            EXPECT_EQ(exchange.now(), done ? exchange.after() : exchange.before()) << nth;
+            EXPECT_FALSE(exchange.interrupted());
+            if (nth > calls)
+                break;
+        }
+}
+
+TEST_P(ProjectExchangeFaults, NothingWorksFromThereOn)
+{
+    const auto [call, canExchange] = GetParam();
+    const LogHandler handler = setLogHandler(nullptr);
+    for (int nth = 1;; ++nth) {
+        for (const bool sameAgain : {true, false}) {
+            const Exchange exchange;
+            int calls = 0;
+            bool done = false;
+            {
+                FaultInjector faults;
+                if (!canExchange)
+                    systemCalls().exchangeNames = failExchange;
+                faults.fail(call, EACCES, nth, 1 << 20);
+                done = exchange.exchange();
+                calls = faults.calls(call);
+            }
+            exchange.expectAllThere();
+            const auto interrupted = exchange.interrupted();
+            if (interrupted) {
+                EXPECT_FALSE(done);
+                EXPECT_EQ(interrupted->backupURL->posixPath(), exchange.package() / kFirst);
+            } else {
+                EXPECT_EQ(exchange.now(), done ? exchange.after() : exchange.before());
+            }
+            if (!done && sameAgain) {
+                EXPECT_TRUE(exchange.exchange());
+                EXPECT_EQ(exchange.now(), exchange.after()) << nth;
+            } else if (!done) { // undone first, then what was asked for
+                EXPECT_TRUE(exchange.exchange(kSecond));
+                EXPECT_TRUE(exchange.exchange(kSecond));
+                EXPECT_EQ(exchange.now(), exchange.before()) << nth;
+            }
+            EXPECT_FALSE(exchange.interrupted());
+            if (nth > calls) {
+                setLogHandler(handler);
+                return;
+            }
+        }
+    }
+}
+
+INSTANTIATE_TEST_SUITE_P(Steps, ProjectExchangeFaults,
+                         testing::Combine(testing::Values(Call::createFile, Call::pwrite, Call::fsync, Call::close,
+                                                          Call::syncFolder, Call::renameWithoutReplacing,
+                                                          Call::exchangeNames, Call::removeFile),
+                                          testing::Bool()));
+
+int changesLeft; // until the process is killed, ahead of the change
+
+void countChange()
+{
+    if (changesLeft-- <= 0)
+        kill(getpid(), SIGKILL);
+}
+
+SystemCalls realCalls;
+
+void killAtChanges()
+{
+    SystemCalls& calls = systemCalls();
+    realCalls = calls;
+    calls.createFile = [](const char* path, std::uint32_t permissions) {
+        countChange();
+        return realCalls.createFile(path, permissions);
+    };
+    calls.pwrite = [](int descriptor, const void* from, std::size_t count, std::int64_t offset) {
+        countChange();
+        return realCalls.pwrite(descriptor, from, count, offset);
+    };
+    calls.renameWithoutReplacing = [](const char* from, const char* to) {
+        countChange();
+        return realCalls.renameWithoutReplacing(from, to);
+    };
+    calls.exchangeNames = [](const char* a, const char* b) {
+        countChange();
+        return realCalls.exchangeNames(a, b);
+    };
+    calls.removeFile = [](const char* path) {
+        countChange();
+        return realCalls.removeFile(path);
+    };
+}
+
+TEST(ProjectExchange, KilledAtEveryChange)
+{
+    const LogHandler handler = setLogHandler(nullptr);
+    for (const bool canExchange : {true, false}) {
+        bool survived = false;
+        for (int change = 0; !survived; ++change) {
+            const Exchange exchange;
+            const pid_t child = fork();
+            if (child == 0) {
+                if (!canExchange)
+                    systemCalls().exchangeNames = failExchange;
+                changesLeft = change;
+                killAtChanges();
+                _exit(exchange.exchange() ? 0 : 1);
+            }
+            int status = 0;
+            ASSERT_EQ(waitpid(child, &status, 0), child);
+            survived = WIFEXITED(status);
+            exchange.expectAllThere();
+            // One that was killed behind the last change has nothing to settle: the record is gone, and all is done.
+            if (!survived && (exchange.interrupted() || exchange.now() != exchange.after())) {
+                EXPECT_TRUE(exchange.exchange());
+            }
+            EXPECT_EQ(exchange.now(), exchange.after()) << change;
+            ASSERT_LT(change, 60);
+        }
+    }
+    setLogHandler(handler);
+}
+
+TEST(ProjectExchange, WhatWasReplacedMeanwhileStays)
+{
+    const LogHandler handler = setLogHandler(nullptr);
+    const Exchange exchange;
+    {
+        FaultInjector faults;
+        faults.fail(Call::exchangeNames, EACCES, 2, 1 << 20); // "ARA Files": the project data has moved
+        faults.fail(Call::renameWithoutReplacing, EACCES, 3, 1 << 20);
+        EXPECT_FALSE(exchange.exchange());
+    }
+    ASSERT_TRUE(exchange.interrupted());
+    EXPECT_FALSE(exchange.interrupted()->isComplete);
+    // An application saves: a new file takes the place of the project data.
+    exchange.package().write(std::string(kAlternative) + "/new", std::string_view("saved anew"));
+    fs::rename(exchange.package() / (std::string(kAlternative) + "/new"),
+               exchange.package() / (std::string(kAlternative) + "/ProjectData"));
+    const Tree before = exchange.now();
+    Error error;
+    EXPECT_FALSE(exchange.exchange(kFirst, &error));
+    EXPECT_NE(error.description.find("has been replaced since"), std::string::npos);
+    Tree after = exchange.now();
+    EXPECT_EQ(after.size() + 1, before.size()); // the record is gone
+    EXPECT_FALSE(exchange.interrupted());
+    EXPECT_TRUE(exchange.exchange()); // and the way is free
+    setLogHandler(handler);
+}
+
+TEST(ProjectExchange, RecordsFromElsewhereMoveNothing)
+{
+    const LogHandler handler = setLogHandler(nullptr);
+    const std::string record = std::string(kAlternative) + "/.exchange.dummy";
+    const auto items = [](std::int64_t number) { return Array(5, Array{number, number}); };
+    const Value cases[] = {
+        "text",
+        Dictionary{},
+        Dictionary{{"Backup", "../../.."}, {"Items", items(0)}},
+        Dictionary{{"Backup", ".."}, {"Items", items(0)}},
+        Dictionary{{"Backup", "/etc"}, {"Items", items(0)}},
+        Dictionary{{"Backup", "00"}, {"Items", items(1)}},
+        Dictionary{{"Backup", "01"}, {"Items", items(-1)}},
+        Dictionary{{"Backup", "00"}, {"Items", Array(4, Array{1, 1})}},
+        Dictionary{{"Backup", "00"}, {"Items", Array(5, Array{1})}},
+        Dictionary{{"Backup", "00"}, {"Items", Array(5, Array{"1", "2"})}},
+        Dictionary{{"Backup", std::string("0\0", 2)}, {"Items", items(0)}},
+    };
+    for (const Value& value : cases) {
+        const Exchange exchange;
+        exchange.package().write(record, *writePropertyList(value, PropertyListFormat::binary));
+        EXPECT_FALSE(exchange.exchange());
+        fs::remove(exchange.package() / record); // forgotten already, or not understood
+        EXPECT_EQ(exchange.now(), exchange.before());
+    }
+    setLogHandler(handler);
+}
+
+TEST(ProjectExchange, WhatStandsAsideIsNotTouched)
+{
+    const Exchange exchange;
+    exchange.package().write(std::string(kAlternative) + "/ProjectData.dummy", std::string_view("somebody's"));
+    const Tree before = exchange.now();
+    Error error;
+    EXPECT_FALSE(exchange.exchange(kFirst, &error));
+    EXPECT_EQ(error.code, EEXIST);
+    EXPECT_EQ(exchange.now(), before);
+}
+
+} // namespace

@@ -1,0 +1,197 @@
+"""ktfiles project, and its objects."""
+import json
+import os
+import plistlib
+import subprocess
+import threading
+import time
+import unittest
+
+from command import KTFILES, MEDIA, CommandTest
+
+ALTERNATIVE = "Alternatives/001/"
+BACKUPS = ALTERNATIVE + "Project File Backups/"
+
+
+class ProjectTest(CommandTest):
+    """`Song.fuguex`: two alternatives, the second one active, with all that an exchange takes along."""
+
+    def setUp(self):
+        super().setUp()
+        self.package = self.folder / "Song.fuguex"
+        self.put("Resources/ProjectInformation.plist", plistlib.dumps({
+            "BundleVersion": 2, "VariantNames": {"0": "Song", "1": "Other"},
+            "VariantNamesV2": {"0": "{PROJECT_NAME}", "1": "Other"}, "ActiveVariant": 1, "HasProjectFolder": False,
+            "LastSavedFrom": "Studio 1.0", "Data": b"\1\2\3\4", "Own": [1.5, True]}, fmt=plistlib.FMT_BINARY))
+        self.meta = {"SampleRate": 48000, "BeatsPerMinute": 98.5, "SongKey": "C", "SongGenderKey": "major",
+                     "SongSignatureNumerator": 3, "SongSignatureDenominator": 4, "NumberOfTracks": 12,
+                     "AudioFiles": ["there.wav", "gone.wav", "/old/Song.fuguex/Media/there.wav"],
+                     "VideoFiles": ["Media/gone.mov"]}
+        self.put(ALTERNATIVE + "MetaData.plist", plistlib.dumps(self.meta))
+        self.put(ALTERNATIVE + "ProjectData", b"data")
+        self.put(ALTERNATIVE + "ARA Files/deep/file", b"ara")
+        self.put("Media/there.wav", b"")
+
+    def put(self, name, content):
+        path = self.package / name
+        path.parent.mkdir(parents=True, exist_ok=True)
+        path.write_bytes(content)
+
+    def read(self, name):
+        return (self.package / name).read_bytes()
+
+    def tree(self):
+        return {str(path.relative_to(self.package)): path.read_bytes()
+                for path in sorted(self.package.rglob("*")) if path.is_file()}
+
+
+class Show(ProjectTest):
+    def test_json_has_the_keys_of_the_dictionaries(self):
+        shown = self.json("project", "Song.fuguex")
+        self.assertEqual(shown["projectInfo"], {
+            "BundleVersion": 2, "VariantNames": {"0": "Song", "1": "Other"},
+            "VariantNamesV2": {"0": "{PROJECT_NAME}", "1": "Other"}, "ActiveVariant": 1, "HasProjectFolder": False,
+            "LastSavedFrom": "Studio 1.0", "Data": "AQIDBA==", "Own": [1.5, True]})
+        first, second = shown["alternatives"]
+        self.assertEqual((first["name"], first["active"], first["metaData"]), ("Song", False, None))
+        self.assertEqual((second["name"], second["active"], second["metaData"]), ("Other", True, self.meta))
+        counts = {item["key"]: (item["count"], item["missing"]) for item in second["media"]}
+        self.assertEqual((counts["AudioFiles"], counts["VideoFiles"], counts["PlaybackFiles"]), ((2, 1), (1, 1), (0, 0)))
+
+    def test_table_and_lines(self):
+        text = self.on_terminal("project", "Song.fuguex", NO_COLOR="1")[0]
+        self.assertIn("version 2, saved from Studio 1.0, media in the package\n", text)
+        self.assertIn("*   1  Other\n       98.5 BPM, C major, 3/4, 12 tracks, 48 kHz\n       audio: 2, 1 missing\n", text)
+        self.assertEqual(self.lines("project", "Song.fuguex")[1],
+                         "1\tactive\tOther\t98.5\tC\tmajor\t3/4\t12\t48000\t3\t2\t0")
+
+    def test_media(self):
+        media = str(self.package / "Media")
+        self.assertEqual(self.lines("project", "media", "Song.fuguex"),
+                         [f"audio\tmissing\t{media}/gone.wav", f"audio\t\t{media}/there.wav",
+                          f"video\tmissing\t{media}/gone.mov"])
+        self.assertEqual(self.json("project", "media", "Song.fuguex", "--missing")["media"],
+                         [{"key": "AudioFiles", "file": f"{media}/gone.wav", "exists": False},
+                          {"key": "VideoFiles", "file": f"{media}/gone.mov", "exists": False}])
+        self.assertIn("no alternative 7", self.failure("project", "media", "Song.fuguex", "--alternative", "7"))
+
+    def json(self, *arguments, **options):
+        return json.loads(self.run_command(*arguments, "--json", **options).stdout)
+
+    def test_dirs(self):
+        before = self.json("project", "dirs", "Song.fuguex")
+        self.assertEqual((before["directoryType"], before["layout"], len(before["directories"])), (0, 1, 17))
+        self.assertEqual([item["type"] for item in before["directories"] if item["exists"]], [14, 15])
+        after = self.json("project", "dirs", "--create", "Song.fuguex")
+        self.assertTrue(all(item["exists"] for item in after["directories"]))
+        self.assertTrue((self.package / "Alternatives/001/Undo Data.nosync").is_dir())
+        os.mkdir(self.folder / "Old.band")
+        self.run_command("project", "dirs", "--create", "Old.band")
+        self.assertTrue((self.folder / "Old.band/Sampler/Sampler Files").is_dir())
+
+    def test_what_is_no_package(self):
+        (self.folder / "Empty.fuguex").mkdir()
+        self.write("File.fuguex", b"")
+        for name in ("Empty.fuguex", "File.fuguex", "None.fuguex"):
+            for arguments in (["project"], ["project", "media"], ["project", "backup"]):
+                self.failure(*arguments, name)
+        shown = json.loads(self.run_command("project", "--json", "None.fuguex", status=1).stdout)
+        self.assertEqual(shown, {"path": "None.fuguex", "error": "file not found"})
+        for arguments in (["project"], ["project", "restore", "Song.fuguex"],
+                          ["project", "rename-alternative", "Song.fuguex", "-1", "x"]):
+            self.failure(*arguments, status=2)
+
+
+class Edits(ProjectTest):
+    def test_backup_and_restore(self):
+        self.assertEqual(self.lines("project", "backup", "Song.fuguex"),
+                         ["Song.fuguex: copied alternative 1 to backup 00"])
+        for item in ("ProjectData", "MetaData.plist", "ARA Files/deep/file"):
+            self.assertEqual(self.read(BACKUPS + "00/" + item), self.read(ALTERNATIVE + item))
+        self.put(ALTERNATIVE + "ProjectData", b"newer")
+        self.put(ALTERNATIVE + "Autosave/one", b"autosave")
+        before = self.tree()
+        self.run_command("project", "restore", "--dry-run", "Song.fuguex", "00")
+        self.run_command("project", "backup", "--dry-run", "Song.fuguex")
+        self.assertEqual(self.tree(), before)
+        self.run_command("project", "restore", "Song.fuguex", "00")
+        self.assertEqual((self.read(ALTERNATIVE + "ProjectData"), self.read(BACKUPS + "00/ProjectData")),
+                         (b"data", b"newer"))
+        self.assertFalse((self.package / ALTERNATIVE / "Autosave").exists())
+        self.run_command("project", "restore", "Song.fuguex", "00")
+        self.assertEqual(self.tree(), before)
+        for name in ("01", "../..", ".", "", "/etc"):
+            self.failure("project", "restore", "Song.fuguex", name)
+        self.put(BACKUPS + "05/MetaData.plist", b"")
+        self.assertIn("This backup is missing data and cannot not be restored.",
+                      self.failure("project", "restore", "Song.fuguex", "05"))
+
+    def test_keep(self):
+        for number in range(4):
+            self.put(ALTERNATIVE + "ProjectData", str(number).encode())
+            stamp = time.time() - 1000 + number
+            os.utime(self.package / ALTERNATIVE / "ProjectData", (stamp, stamp))
+            self.run_command("project", "backup", "Song.fuguex", "--keep", "2")
+        kept = sorted(self.read(BACKUPS + name + "/ProjectData") for name in os.listdir(self.package / BACKUPS))
+        self.assertEqual(kept, [b"2", b"3"])
+
+    def test_failed_backup_leaves_nothing(self):
+        self.run_command("project", "backup", "Song.fuguex")
+        before = self.tree()
+        self.put(ALTERNATIVE + "ProjectData", b"x" * 100000)
+        with_limit = 'trap "" XFSZ; ulimit -f 32; exec "$0" project backup Song.fuguex --keep 1'
+        result = subprocess.run(["bash", "-c", with_limit, KTFILES], cwd=self.folder, capture_output=True, timeout=60)
+        self.assertEqual(result.returncode, 1, result.stderr)
+        self.put(ALTERNATIVE + "ProjectData", b"data")
+        self.assertEqual(self.tree(), before)
+        os.remove(self.package / ALTERNATIVE / "ProjectData")
+        self.assertIn("no project data", self.failure("project", "backup", "Song.fuguex"))
+
+    def test_rename(self):
+        self.run_command("project", "rename-alternative", "--dry-run", "Song.fuguex", "1", "Song, slower")
+        self.assertEqual(self.json("project", "Song.fuguex")["alternatives"][1]["name"], "Other")
+        self.run_command("project", "rename-alternative", "--backup", "Song.fuguex", "1", "Song, slower")
+        info = plistlib.loads(self.read("Resources/ProjectInformation.plist"))
+        self.assertEqual(info["VariantNamesV2"], {"0": "{PROJECT_NAME}", "1": "{PROJECT_NAME}, slower"})
+        self.assertEqual(info["Own"], [1.5, True])
+        self.assertTrue(info["LastSavedFrom"].startswith("ktfiles "))
+        backup = plistlib.loads(self.read("Resources/ProjectInformation.plist.bak"))
+        self.assertEqual((backup["VariantNames"]["1"], backup["LastSavedFrom"]), ("Other", "Studio 1.0"))
+        os.rename(self.package, self.folder / "Tune.fuguex")
+        self.assertEqual(self.json("project", "Tune.fuguex")["projectInfo"]["VariantNames"],
+                         {"0": "Tune", "1": "Tune, slower"})
+        self.assertIn("no alternative 2", self.failure("project", "rename-alternative", "Tune.fuguex", "2", "x"))
+
+    def test_interrupted_exchange_is_told_and_settled(self):
+        self.put(BACKUPS + "00/ProjectData", b"old")
+        after = [[0, 0] for _ in range(5)]
+        places = ("Autosave", "ProjectData", "ARA Files", "MetaData.plist", "MetaData.bak")
+        for pair, name in zip(after, places):
+            for side, folder in enumerate((ALTERNATIVE, BACKUPS + "00/")):
+                if (self.package / folder / name).exists():
+                    pair[side] = (self.package / folder / name).stat().st_ino
+        self.put(ALTERNATIVE + ".exchange.dummy", plistlib.dumps({"Backup": "00", "Items": after}))
+        self.assertEqual(self.json("project", "Song.fuguex")["alternatives"][1]["interruptedExchange"], "00")
+        self.failure("project", "backup", "Song.fuguex")
+        self.assertIn("was cut short; completed it", self.lines("project", "restore", "Song.fuguex", "00")[0])
+        self.assertEqual((self.read(ALTERNATIVE + "ProjectData"), self.read(BACKUPS + "00/ProjectData")),
+                         (b"old", b"data"))
+
+    def test_edits_wait_for_each_other(self):
+        runs = [threading.Thread(target=self.run_command, args=("project", "backup", "Song.fuguex")) for _ in range(6)]
+        for run in runs:
+            run.start()
+        for run in runs:
+            run.join()
+        self.assertEqual(sorted(os.listdir(self.package / BACKUPS)), ["00", "01", "02", "03", "04", "05"])
+
+
+class Example(CommandTest):
+    def test_example_package(self):
+        shown = self.json("project", str(MEDIA / "Sketch.fuguex"))
+        self.assertEqual([item["name"] for item in shown["alternatives"]], ["Sketch", "Sketch, slower"])
+        self.assertEqual([item["name"] for item in shown["alternatives"][1]["backups"]], ["00"])
+
+
+if __name__ == "__main__":
+    unittest.main()

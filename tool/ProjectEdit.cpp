@@ -1,0 +1,32 @@
+#include "ProjectEdit.h"
+
+#include "Descriptor.h"
+#include "Failure.h"
+#include "TemporaryFile.h"
+
+#include <cerrno>
+#include <fcntl.h>
+#include <sys/file.h>
+
+void editProject(const std::string& package, const std::function<void()>& edit)
+{
+    const Descriptor folder(::open(package.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
+    if (!folder)
+        throw Failure(systemErrorText(errno));
+    while (::flock(folder.get(), LOCK_EX) != 0)
+        if (errno != EINTR) // a file system without locks
+            break;
+    const SignalHold hold;
+    edit();
+}
+
+bool endIsWanted()
+{
+    sigset_t waiting;
+    if (::sigpending(&waiting) != 0)
+        return false;
+    for (const int signal : {SIGINT, SIGTERM, SIGHUP})
+        if (sigismember(&waiting, signal) == 1)
+            return true;
+    return false;
+}

@@ -1,0 +1,15 @@
+// The files that a project uses, and the folders that it has for them.
+#pragma once
+
+#include "Output.h"
+#include "project/ProjectInformation.h"
+
+#include <optional>
+
+/// Of one alternative, or of all; each file once for each kind, in the order of the names' bytes.
+void printProjectMedia(const std::string& path, ProjectInformation& project, std::optional<long> alternative,
+                       bool onlyMissing, const OutputOptions& options);
+
+/// Of any kind of project; created first where that is asked for. Throws Failure.
+void printProjectDirectories(const std::string& path, std::optional<long> alternative, bool create,
+                             const OutputOptions& options);

@@ -1,0 +1,14 @@
+// What `ktfiles project` tells of a package.
+#pragma once
+
+#include "Output.h"
+#include "project/ProjectInformation.h"
+
+#include <nlohmann/json_fwd.hpp>
+
+/// A value of a property list: data as base64, dates as ISO 8601 in UTC.
+nlohmann::ordered_json projectJson(const platform::Value& value);
+/// "2026-11-21T09:30:00Z".
+std::string dateText(platform::Date date);
+
+void printProject(const std::string& path, ProjectInformation& project, const OutputOptions& options);

@@ -4,6 +4,7 @@
 #include "AdmTree.h"
 #include "CommandLine.h"
 #include "Failure.h"
+#include "FileAccess.h"
 #include "JsonWriter.h"
 #include "Progress.h"
 
@@ -113,6 +114,7 @@ private:
     bool runFile(const std::string& path)
     {
         try {
+            const FileAccess access = accessForReading(path, options_.quiet);
             const bool tells = arguments_.isCheck || arguments_.isLenient;
             ReadDocument read = readDocument(path, arguments_, options_.quiet, tells ? Diagnose::yes : Diagnose::no);
             // To know the place of everything costs a ninth of the time, which only documents with a problem pay.

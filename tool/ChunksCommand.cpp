@@ -2,6 +2,7 @@
 
 #include "CommandLine.h"
 #include "Failure.h"
+#include "FileAccess.h"
 #include "InputFile.h"
 #include "Table.h"
 
@@ -79,8 +80,9 @@ private:
     Output& output_ = Output::standard();
 };
 
-void listFile(const std::string& path, ChunkListWriter& writer)
+void listFile(const std::string& path, ChunkListWriter& writer, bool quiet)
 {
+    const FileAccess access = accessForReading(path, quiet);
     CAudioFileIO file;
     openContainer(file, path, 0);
     ContainerExtent extent;
@@ -112,7 +114,7 @@ bool runList(const std::vector<std::string>& files, const OutputOptions& options
         std::string error;
         if (!reportingFailures(path, [&] {
                 try {
-                    listFile(path, writer);
+                    listFile(path, writer, options.quiet);
                 } catch (const Failure& failure) {
                     error = failure.what();
                     throw;

@@ -3,6 +3,7 @@
 #include "ChunksCommand.h"
 #include "CommandLine.h"
 #include "Failure.h"
+#include "FileAccess.h"
 #include "InputFile.h"
 #include "OutputFile.h"
 #include "Progress.h"
@@ -83,6 +84,7 @@ void getFromAnywhere(const GetArguments& arguments, const OutputOptions& options
 
 void getChunk(const GetArguments& arguments, const OutputOptions& options)
 {
+    const FileAccess access = accessForReading(arguments.file, options.quiet);
     if (!arguments.sidecar.empty())
         return getFromAnywhere(arguments, options);
     CAudioFileIO file;

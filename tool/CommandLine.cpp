@@ -17,12 +17,12 @@ constexpr char kBracketGuard = '\x01';
 std::string guarded(std::string argument)
 {
     const bool looksLikeList = argument.size() >= 2 && argument.front() == '[' && argument.back() == ']';
-    return looksLikeList ? kBracketGuard + argument : argument;
+    return looksLikeList || argument.starts_with(kBracketGuard) ? kBracketGuard + argument : argument;
 }
 
 std::string& unguarded(std::string& argument)
 {
-    if (argument.size() >= 2 && argument[0] == kBracketGuard && argument[1] == '[')
+    if (argument.size() >= 2 && argument[0] == kBracketGuard && (argument[1] == '[' || argument[1] == kBracketGuard))
         argument.erase(0, 1);
     return argument;
 }
@@ -30,6 +30,12 @@ std::string& unguarded(std::string& argument)
 std::string fileProblem(std::string& argument)
 {
     return unguarded(argument) == "-" ? "\"-\" is not a file name; a file of that name is \"./-\"" : "";
+}
+
+std::string noProblem(std::string& argument)
+{
+    unguarded(argument);
+    return "";
 }
 
 std::string pathProblem(std::string& argument)
@@ -54,6 +60,9 @@ std::string colorProblem(std::string& argument)
         std::any_of(kColorModes.begin(), kColorModes.end(), [&](const auto& mode) { return mode.first == argument; });
     return known ? "" : "\"" + printable(argument) + "\" is none of auto, always, never";
 }
+
+// The group of options that are words for another program, behind "--".
+constexpr const char* kWordsGroup = "Words";
 
 const CLI::App* findVerb(const CLI::App& app, const std::string& name)
 {
@@ -84,14 +93,19 @@ private:
     {
         std::string line = name;
         for (const CLI::Option* option : app.get_options([](const CLI::Option* one) { return one->get_positional(); }))
-            line += " " + option->get_name(true) + (option->get_expected_max() > 1 ? "..." : "");
-        return line + (app.get_parent() == nullptr ? " VERB [OBJECT] FILE... [options]" : " [options]");
+            if (option->get_group() != kWordsGroup)
+                line += " " + option->get_name(true) + (option->get_expected_max() > 1 ? "..." : "");
+        line += app.get_parent() == nullptr ? " VERB [OBJECT] FILE... [options]" : " [options]";
+        for (const CLI::Option* words :
+             app.get_options([](const CLI::Option* one) { return one->get_group() == kWordsGroup; }))
+            line += " [-- " + words->get_name(true) + "...]";
+        return line;
     }
 };
 
-std::map<int, void (*)(CommandLine&)>& registeredVerbs()
+std::multimap<int, void (*)(CommandLine&)>& registeredVerbs()
 {
-    static std::map<int, void (*)(CommandLine&)> verbs;
+    static std::multimap<int, void (*)(CommandLine&)> verbs;
     return verbs;
 }
 
@@ -157,6 +171,15 @@ CLI::Option* CommandLine::addFiles(CLI::App& verb, std::vector<std::string>& fil
         ->transform(CLI::Validator(fileProblem, ""));
 }
 
+CLI::Option* CommandLine::addWords(CLI::App& verb, const std::string& name, std::vector<std::string>& words,
+                                   const std::string& description)
+{
+    return verb.add_option(name, words, description)
+        ->option_text("...")
+        ->group(kWordsGroup)
+        ->transform(CLI::Validator(noProblem, ""));
+}
+
 CLI::Option* CommandLine::addChunkId(CLI::App& verb, FourCC& id)
 {
     return verb
@@ -217,7 +240,7 @@ int CommandLine::parseAndRun(std::vector<std::string> arguments)
             fmt::print(stderr, "{}", app_.help());
             return kExitUsage;
         }
-        return work_.at(verb)() ? kExitOK : kExitFailed;
+        return work_.at(verb)() ? kExitOK : failureStatus_;
     } catch (const CLI::CallForHelp&) {
         Output::standard().write(app_.help());
         return kExitOK;
@@ -250,7 +273,7 @@ int CommandLine::run(int argc, char** argv)
 
 VerbRegistration::VerbRegistration(int rank, void (*declare)(CommandLine&))
 {
-    registeredVerbs()[rank] = declare;
+    registeredVerbs().emplace(rank, declare);
 }
 
 void VerbRegistration::declareAll(CommandLine& commandLine)

@@ -29,11 +29,17 @@ public:
     // Arguments that verbs have in common. The values must outlive the parsing.
     static CLI::Option* addFile(CLI::App& verb, std::string& file, const std::string& name = "FILE");
     static CLI::Option* addFiles(CLI::App& verb, std::vector<std::string>& files, const std::string& name = "FILE");
+    /// Words that are another program's business; they come last.
+    static CLI::Option* addWords(CLI::App& verb, const std::string& name, std::vector<std::string>& words,
+                                 const std::string& description);
     static CLI::Option* addChunkId(CLI::App& verb, FourCC& id);
     /// An option whose value names a file; "-" stands for standard input or output.
     static CLI::Option* addPath(CLI::App& verb, const std::string& name, std::string& path,
                                 const std::string& description);
     static void addEditOptions(CLI::App& verb, EditOptions& options);
+
+    /// The exit status when the verb's work tells that not all went well, in the place of kExitFailed.
+    void setFailureStatus(int status) { failureStatus_ = status; }
 
     /// Parses and does what is asked; the exit status of the process.
     int run(int argc, char** argv);
@@ -46,6 +52,7 @@ private:
 
     CLI::App app_;
     OutputOptions output_;
+    int failureStatus_ = kExitFailed;
     std::map<const CLI::App*, std::function<bool()>> work_;
     std::vector<std::string> helpTopics_;
 };

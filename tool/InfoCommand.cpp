@@ -2,6 +2,7 @@
 #include "ClockTime.h"
 #include "CommandLine.h"
 #include "Failure.h"
+#include "FileAccess.h"
 #include "FileFacts.h"
 #include "InputFile.h"
 #include "Table.h"
@@ -10,8 +11,9 @@
 
 namespace {
 
-AudioFileInfo describe(const std::string& path)
+AudioFileInfo describe(const std::string& path, bool quiet)
 {
+    const FileAccess access = accessForReading(path, quiet);
     CFileIO file;
     requireOK(file.OpenRead(referenceTo(path), 0));
     AudioFileInfo info;
@@ -186,7 +188,7 @@ bool runInfo(const std::vector<std::string>& files, bool isLong, const OutputOpt
         if (Output::standard().failed())
             break;
         try {
-            writer.add(path, describe(path));
+            writer.add(path, describe(path, options.quiet));
         } catch (const Failure& failure) {
             good = false;
             writer.addFailure(path, failure.what());

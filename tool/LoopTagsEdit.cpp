@@ -1,6 +1,7 @@
 #include "LoopTagsEdit.h"
 
 #include "Failure.h"
+#include "FileAccess.h"
 #include "LoopTagFields.h"
 #include "Terminal.h"
 #include "audiofile/ContainerHeaders.h"
@@ -310,6 +311,7 @@ bool editTags(const std::vector<std::string>& files, const TagsEditor& editor, E
     edit.quiet = output.quiet;
     for (const std::string& path : files)
         try {
+            const FileAccess access = accessForReading(path, output.quiet);
             editor.plan(readLoopTags(path), path);
         } catch (const Failure&) { // reported when its turn comes
         }

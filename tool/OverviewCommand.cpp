@@ -2,6 +2,7 @@
 #include "ClockTime.h"
 #include "CommandLine.h"
 #include "Failure.h"
+#include "FileAccess.h"
 #include "OutputFile.h"
 #include "OverviewReport.h"
 #include "PNGPicture.h"
@@ -59,8 +60,11 @@ void workOn(const std::string& path, const OverviewArguments& arguments, Overvie
                         .store = {},
                         .dryRun = arguments.edit.dryRun};
     std::optional<SafeEdit> edit; // ahead of the reading, so that it notices changes made meanwhile
+    FileAccess access;
     if (arguments.store)
         edit.emplace(path, arguments.edit);
+    else
+        access = accessForReading(path, arguments.edit.quiet);
     FileOverview overview =
         arguments.fromStored ? FileOverview::stored(path) : FileOverview::computed(path, arguments.edit.quiet);
     if (arguments.draws())

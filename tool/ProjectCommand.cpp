@@ -257,6 +257,6 @@ void declareProject(CommandLine& commandLine)
     declareEdits(commandLine, verb, arguments);
 }
 
-const VerbRegistration registration{70, declareProject};
+const VerbRegistration registration{65, declareProject};
 
 } // namespace

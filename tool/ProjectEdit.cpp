@@ -2,20 +2,18 @@
 
 #include "Descriptor.h"
 #include "Failure.h"
+#include "FileAccess.h"
 #include "TemporaryFile.h"
 
 #include <cerrno>
 #include <fcntl.h>
-#include <sys/file.h>
 
 void editProject(const std::string& package, const std::function<void()>& edit)
 {
     const Descriptor folder(::open(package.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
     if (!folder)
         throw Failure(systemErrorText(errno));
-    while (::flock(folder.get(), LOCK_EX) != 0)
-        if (errno != EINTR) // a file system without locks
-            break;
+    const FileAccess access = accessForWriting(package, platform::FileCoordinator::WritingOptions::none, false);
     const SignalHold hold;
     edit();
 }

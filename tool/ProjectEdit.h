@@ -4,7 +4,7 @@
 #include <functional>
 #include <string>
 
-/// Runs `edit` while no other edit of the package by this command does; signals that end a process wait until it is
+/// Runs `edit` under a coordinated write of the package; signals that end a process wait until it is
 /// done. `edit` may ask `endIsWanted` and give up. Throws Failure, also what `edit` throws.
 void editProject(const std::string& package, const std::function<void()>& edit);
 

@@ -38,12 +38,22 @@ std::string backupName(const std::string& target, int number)
 
 constexpr int kMostBackups = 10000;
 
+FileAccess accessFor(const std::string& target, const EditOptions& options)
+{
+    using WritingOptions = platform::FileCoordinator::WritingOptions;
+    return options.dryRun
+               ? accessForReading(target, options.quiet)
+               : accessForWriting(target, options.inPlace ? WritingOptions::none : WritingOptions::forReplacing,
+                                  options.quiet);
+}
+
 } // namespace
 
 SafeEdit::SafeEdit(const std::string& path, const EditOptions& options) : options_(options)
 {
     requireRegularFile(path);
     target_ = resolvedPath(path);
+    access_ = accessFor(target_, options_);
     // Whoever held the lock may have put a new file in the place of the one that was waited for.
     do {
         open();

@@ -3,6 +3,7 @@
 #pragma once
 
 #include "Descriptor.h"
+#include "FileAccess.h"
 
 #include <functional>
 #include <string>
@@ -16,8 +17,9 @@ struct EditOptions {
     bool quiet = false;
 };
 
-/// One edit of one file. From construction to destruction the file is locked against other edits by this command;
-/// they wait. Throws Failure.
+/// One edit of one file. From construction to destruction it has coordinated write access (a dry run: read access), so
+/// that nobody who coordinates looks at the file or changes it meanwhile; and the file is locked against edits by this
+/// command of other users, or under another name. They wait. Throws Failure.
 class SafeEdit {
 public:
     /// Follows symbolic links to the file itself, which must be regular and writable.
@@ -42,6 +44,7 @@ private:
 
     std::string target_;
     EditOptions options_;
+    FileAccess access_;
     Descriptor file_;
     struct stat status_ = {}; // when the edit began
 };

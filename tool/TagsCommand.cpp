@@ -2,6 +2,7 @@
 
 #include "CommandLine.h"
 #include "Failure.h"
+#include "FileAccess.h"
 #include "LoopTags.h"
 
 #include <nlohmann/json.hpp>
@@ -80,6 +81,7 @@ bool runTags(const std::vector<std::string>& files, const OutputOptions& options
         if (Output::standard().failed())
             break;
         try {
+            const FileAccess access = accessForReading(path, options.quiet);
             writer.add(path, readLoopTags(path));
         } catch (const Failure& failure) {
             good = false;

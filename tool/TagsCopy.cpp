@@ -1,6 +1,7 @@
 // ktfiles tags copy: every kind of loop chunk from one file to others, AIFF and CAF in either direction.
 #include "CommandLine.h"
 #include "Failure.h"
+#include "FileAccess.h"
 #include "LoopTagFields.h"
 #include "LoopTagsEdit.h"
 #include "TagsCommand.h"
@@ -19,8 +20,9 @@ struct Source {
     VireoLoopChunkList chunks = VireoLoopChunks::Empty();
 };
 
-std::shared_ptr<const Source> readSource(const std::string& path)
+std::shared_ptr<const Source> readSource(const std::string& path, bool quiet)
 {
+    const FileAccess access = accessForReading(path, quiet);
     auto source = std::make_shared<Source>();
     source->tags = readLoopTags(path);
     openLoopFile(path, platform::AudioFile::Permission::read).readChunks(source->chunks);
@@ -155,7 +157,7 @@ bool runCopy(const CopyArguments& arguments, const OutputOptions& output)
 {
     std::shared_ptr<const Source> source;
     if (!reportingFailures(arguments.from, [&] {
-            source = readSource(arguments.from);
+            source = readSource(arguments.from, output.quiet);
             if (!source->tags.isLoop() && source->tags.info.empty())
                 throw Failure("has no loop tags");
         }))

@@ -11,19 +11,29 @@ _ktfiles()
     local projects='media dirs backup restore rename-alternative'
     local verb=${words[1]} object=${words[2]}
 
+    if [[ $verb == lock ]]; then
+        local i
+        for ((i = 2; i < cword; ++i)); do
+            if [[ ${words[i]} == -- ]]; then
+                _command_offset $((i + 1))
+                return
+            fi
+        done
+    fi
+
     case $prev in
         --color) COMPREPLY=($(compgen -W 'auto always never' -- "$cur")); return ;;
         --from | -o | --output | --png | --svg) _filedir; return ;;
         --sidecar) return ;;
         --colors) COMPREPLY=($(compgen -W 'night day amber rose ink' -- "$cur")); return ;;
-        --width | --height | --start | --end | --alternative | --keep) return ;;
+        --width | --height | --start | --end | --alternative | --keep | --timeout) return ;;
     esac
 
     if ((cword == 1)); then
-        COMPREPLY=($(compgen -W 'info pair chunks tags scan overview adm project help --help --version' -- "$cur"))
+        COMPREPLY=($(compgen -W 'info pair chunks tags scan overview adm project lock locks help --help --version' -- "$cur"))
     elif [[ $verb == help ]]; then
         if ((cword == 2)); then
-            COMPREPLY=($(compgen -W 'info pair chunks tags scan overview adm project' -- "$cur"))
+            COMPREPLY=($(compgen -W 'info pair chunks tags scan overview adm project lock locks' -- "$cur"))
         elif ((cword == 3)) && [[ $object == chunks ]]; then
             COMPREPLY=($(compgen -W 'get add remove' -- "$cur"))
         elif ((cword == 3)) && [[ $object == tags ]]; then
@@ -41,6 +51,7 @@ _ktfiles()
             tags/set | tags/remove | tags/copy) COMPREPLY=($(compgen -W "$edit $common" -- "$cur")) ;;
             overview/*) COMPREPLY=($(compgen -W "--png --svg --width --height --start --end --scale --colors --stored
                 --store $edit $common" -- "$cur")) ;;
+            lock/*) COMPREPLY=($(compgen -W "--read --write --presenter --timeout -- $common" -- "$cur")) ;;
             scan/*) COMPREPLY=($(compgen -W "--csv --threads $common" -- "$cur")) ;;
             project/media) COMPREPLY=($(compgen -W "--missing --alternative $common" -- "$cur")) ;;
             project/dirs) COMPREPLY=($(compgen -W "--create --alternative $common" -- "$cur")) ;;

@@ -2,6 +2,7 @@
 // AIFC, CAF). Works on the file itself, through platform/SystemCalls.h, and keeps a chunk scanner of its own.
 #pragma once
 
+#include "platform/AudioHandle.h"
 #include "platform/SampleConversion.h"
 #include "platform/URL.h"
 #include "platform/core/Bytes.h"
@@ -44,9 +45,18 @@ static_assert(sizeof(StreamDescription) == 40);
 /// User data are the blocks that a container carries beside the samples, named by a four-character type and, where a
 /// type occurs more than once, by their index in file order. Chunks that make up the container or describe the samples
 /// ("fmt ", "COMM", "desc", "data", …) can be read so, but not set or removed; filler ("free") is no user data.
-class KT_EXPORT AudioFile {
+class KT_EXPORT AudioFile final : public AudioHandle {
 public:
     enum class Permission { read, readWrite };
+    enum CreationFlag : std::uint32_t { eraseExisting = 1 };
+
+    // What property() answers by id; none of it can be set.
+    static constexpr FourCC fileTypeProperty = fourCC("ffmt");    // FourCC
+    static constexpr FourCC dataFormatProperty = fourCC("dfmt");  // StreamDescription
+    static constexpr FourCC byteCountProperty = fourCC("bcnt");   // 64-bit
+    static constexpr FourCC packetCountProperty = fourCC("pcnt"); // 64-bit
+    static constexpr FourCC dataOffsetProperty = fourCC("doff");  // 64-bit
+    static constexpr auto kUnsupportedProperty = static_cast<std::int32_t>(fourCC("pty?"));
 
     /// Null, with `*status`, when the file cannot be opened or is of no kind that the service knows
     /// (kStatusParameterError). `typeHint` names the container to assume where the bytes leave it open; they never do
@@ -55,12 +65,15 @@ public:
                                            std::int32_t* status);
     /// Creates a file without samples, open for reading and writing. `fileType` is "WAVE", "AIFF", "AIFC" or "caff";
     /// the format is linear PCM that the container can hold: little-endian in WAVE (8 bits unsigned), big-endian in
-    /// AIFF, without floats there. Else kStatusParameterError; kStatusDuplicateName when the file exists.
+    /// AIFF, without floats there. Else kStatusParameterError; kStatusDuplicateName when the file exists, unless
+    /// `flags` (of CreationFlag, others are ignored) let it be emptied.
     static std::unique_ptr<AudioFile> create(const URL& url, FourCC fileType, const StreamDescription& format,
-                                             std::int32_t* status);
-    ~AudioFile();
-    AudioFile(const AudioFile&) = delete;
-    AudioFile& operator=(const AudioFile&) = delete;
+                                             std::int32_t* status, std::uint32_t flags = 0);
+    ~AudioFile() override;
+
+    std::int32_t propertyInfo(FourCC id, std::uint32_t& size, bool& isWritable) override;
+    std::int32_t property(FourCC id, std::uint32_t& size, void* data) override;
+    std::int32_t setProperty(FourCC id, std::uint32_t size, const void* data) override;
 
     /// "WAVE" (RF64 and BW64 too), "AIFF", "AIFC" or "caff".
     FourCC fileType() const;

@@ -32,6 +32,9 @@ KT_EXPORT void samplesToFloat(const void* samples, SampleFormat format, float* t
 /// that came from samplesToFloat come back unchanged (32-bit ones to the 24 bits that a float holds).
 KT_EXPORT void floatToSamples(const float* from, SampleFormat format, void* samples, std::size_t count);
 
+/// Reverses the bytes of each of `count` samples of 1 to 4, or 8, bytes, in place; `samples` needs no alignment.
+KT_EXPORT void swapSamples(void* samples, int bytesPerSample, std::size_t count);
+
 /// The plain roads, without vector instructions: what the fast ones are proven equal to.
 KT_EXPORT void samplesToFloatPlain(const void* samples, SampleFormat format, float* to, std::size_t count);
 KT_EXPORT void floatToSamplesPlain(const float* from, SampleFormat format, void* samples, std::size_t count);

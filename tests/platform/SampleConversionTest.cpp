@@ -155,3 +155,20 @@ TEST(SampleConversion, FastRoadsGiveWhatThePlainOnesGive)
 }
 
 } // namespace
+
+TEST(SampleConversion, SwapsSamplesInPlace)
+{
+    const struct {
+        int bytes;
+        std::string expected;
+    } cases[] = {{1, ".abcdefghijklmnopqrstuvwx"},
+                 {2, ".badcfehgjilknmporqtsvuxw"},
+                 {3, ".cbafedihglkjonmrqputsxwv"},
+                 {4, ".dcbahgfelkjiponmtsrqxwvu"},
+                 {8, ".hgfedcbaponmlkjixwvutsrq"}};
+    for (const auto& test : cases) {
+        std::string samples = ".abcdefghijklmnopqrstuvwx"; // at an odd address
+        platform::swapSamples(samples.data() + 1, test.bytes, 24U / static_cast<unsigned>(test.bytes));
+        EXPECT_EQ(samples, test.expected);
+    }
+}

@@ -70,7 +70,8 @@ StreamDescription StreamDescription::packedPCM(double sampleRate, std::uint32_t 
     return format;
 }
 
-AudioFile::AudioFile(std::unique_ptr<Implementation> implementation) : implementation_(std::move(implementation))
+AudioFile::AudioFile(std::unique_ptr<Implementation> implementation) :
+    AudioHandle(Kind::file), implementation_(std::move(implementation))
 {
 }
 AudioFile::~AudioFile() = default;
@@ -103,7 +104,7 @@ std::unique_ptr<AudioFile> AudioFile::open(const URL& url, Permission permission
 }
 
 std::unique_ptr<AudioFile> AudioFile::create(const URL& url, FourCC fileType, const StreamDescription& format,
-                                             std::int32_t* status)
+                                             std::int32_t* status, std::uint32_t flags)
 {
     std::int32_t ignored;
     std::int32_t& result = status != nullptr ? *status : ignored;
@@ -113,16 +114,25 @@ std::unique_ptr<AudioFile> AudioFile::create(const URL& url, FourCC fileType, co
         result = kStatusParameterError;
         return nullptr;
     }
-    const int descriptor = systemCalls().createFile(path.c_str(), 0666);
-    if (descriptor < 0) {
-        result = failure();
-        return nullptr;
+    int descriptor = systemCalls().createFile(path.c_str(), 0666);
+    result = descriptor < 0 ? failure() : kStatusOK;
+    const bool isThere = result == kStatusDuplicateName && (flags & eraseExisting);
+    if (isThere) {
+        descriptor = systemCalls().openFile(path.c_str(), OpenFor::readingAndWriting, nullptr);
+        result = descriptor < 0 ? failure() : kStatusOK;
     }
-    result = FileBytes(descriptor).write(0, content.data(), content.size());
+    if (result != kStatusOK)
+        return nullptr;
+    {
+        const FileBytes bytes(descriptor);
+        result = isThere ? bytes.setLength(0) : kStatusOK;
+        if (result == kStatusOK)
+            result = bytes.write(0, content.data(), content.size());
+    }
     std::unique_ptr<AudioFile> file;
     if (result == kStatusOK)
         file = open(url, Permission::readWrite, fileType, &result);
-    if (!file)
+    if (!file && !isThere)
         std::remove(path.c_str()); // ours: it was created just now, or creating it had failed
     return file;
 }

@@ -5,6 +5,7 @@
 
 #include <algorithm>
 #include <cmath>
+#include <utility>
 
 namespace platform {
 namespace {
@@ -118,6 +119,13 @@ void withStep(SampleFormat format, Use use)
 
 const bool fastRoad = hasAVX2();
 
+template <class T>
+void swapEach(Byte* at, std::size_t count)
+{
+    for (std::size_t i = 0; i < count; ++i)
+        store(at + i * sizeof(T), load<T>(at + i * sizeof(T), std::endian::little), std::endian::big);
+}
+
 } // namespace
 
 void samplesToFloatPlain(const void* samples, SampleFormat format, float* to, std::size_t count)
@@ -136,6 +144,25 @@ void floatToSamplesPlain(const float* from, SampleFormat format, void* samples, 
         for (std::size_t i = 0; i < count; ++i)
             step.write(to + i * step.size, from[i]);
     });
+}
+
+void swapSamples(void* samples, int bytesPerSample, std::size_t count)
+{
+    auto* at = static_cast<Byte*>(samples);
+    switch (bytesPerSample) {
+    case 2:
+        return swapEach<std::uint16_t>(at, count);
+    case 3:
+        for (std::size_t i = 0; i < count; ++i)
+            std::swap(at[3 * i], at[3 * i + 2]);
+        return;
+    case 4:
+        return swapEach<std::uint32_t>(at, count);
+    case 8:
+        return swapEach<std::uint64_t>(at, count);
+    default:
+        return;
+    }
 }
 
 void samplesToFloat(const void* samples, SampleFormat format, float* to, std::size_t count)

@@ -1,0 +1,248 @@
+#include "audiofile/CAuFileIO.h"
+
+#include "loops/tagging/ChunkIDs.h"
+#include "platform/core/Packed.h"
+#include "platform/core/Status.h"
+
+#include <new>
+#include <utility>
+
+namespace {
+
+using platform::AudioFile;
+using platform::StreamDescription;
+
+constexpr std::int32_t kNotLinearPCM = -208;
+constexpr FourCC kWAVE = fourCC("WAVE");
+
+constexpr int kFound = 1;
+constexpr int kAdded = 1;
+constexpr int kNotOpen = -1;
+constexpr int kNoItem = -2;
+constexpr int kItemUnreadable = -3;
+
+StreamDescription newDataFormat(int channels, int bits, long sampleRate, FourCC fileType)
+{
+    const std::uint32_t kind = bits == 32 ? StreamDescription::isFloat : StreamDescription::isSignedInteger;
+    const std::uint32_t order = fileType == kWAVE ? 0u : StreamDescription::isBigEndian;
+    StreamDescription format;
+    format.sampleRate = static_cast<double>(sampleRate);
+    format.formatId = StreamDescription::linearPCM;
+    format.formatFlags = kind | order | StreamDescription::isPacked;
+    format.channelsPerFrame = static_cast<std::uint32_t>(channels);
+    format.bitsPerChannel = static_cast<std::uint32_t>(bits);
+    format.framesPerPacket = 1;
+    format.bytesPerPacket = format.bytesPerFrame = format.bitsPerChannel / 8 * format.channelsPerFrame;
+    return format;
+}
+
+template <class T>
+void reverseUnlessWAVE(FourCC fileType, T& value)
+{
+    if (fileType != kWAVE)
+        value = byteSwapped(value);
+}
+
+} // namespace
+
+CAuFileIO::CAuFileIO()
+{
+    Init();
+}
+
+CAuFileIO::CAuFileIO(int& status, const CFileRef& ref, unsigned char write) : mFileRef(ref)
+{
+    Init();
+    status = Open(write);
+}
+
+CAuFileIO::~CAuFileIO() = default;
+
+void CAuFileIO::Init()
+{
+    mFile.reset();
+    mFileType = 0;
+    mOpenMode = kClosed;
+    ResetCounts();
+}
+
+void CAuFileIO::ResetCounts()
+{
+    mDataFormat = {};
+    mAudioByteCount = mPacketCount = 0;
+}
+
+std::int32_t CAuFileIO::Open(unsigned char write)
+{
+    const std::int32_t wanted = write ? kReadWrite : kReadOnly;
+    if (mFile && mOpenMode == wanted)
+        return kStatusOK;
+    Close();
+    ResetCounts();
+    mOpenMode = wanted;
+    if (!mFileRef.URL())
+        return kStatusParameterError;
+    std::int32_t status = kStatusOK;
+    mFile = AudioFile::open(*mFileRef.URL(), write ? AudioFile::Permission::readWrite : AudioFile::Permission::read, 0,
+                            &status);
+    if (!mFile)
+        return status;
+    status = ReadDescription();
+    if (status != kStatusOK)
+        CloseFileAndInit();
+    return status;
+}
+
+std::int32_t CAuFileIO::ReadDescription()
+{
+    std::int32_t status = mFile->dataFormat(mDataFormat);
+    if (status == kStatusOK && !mDataFormat.isLinearPCM())
+        status = kNotLinearPCM;
+    if (status == kStatusOK)
+        status = mFile->audioDataByteCount(mAudioByteCount);
+    if (status == kStatusOK)
+        status = mFile->audioDataPacketCount(mPacketCount);
+    if (status == kStatusOK)
+        mFileType = mFile->fileType();
+    return status;
+}
+
+std::int32_t CAuFileIO::Open(const CFileRef& ref, unsigned char write)
+{
+    Close();
+    mFileRef = ref;
+    return Open(write);
+}
+
+std::int32_t CAuFileIO::Open(const platform::FileHandle* handle, unsigned char write)
+{
+    CFileRef ref;
+    ref.Set(handle);
+    return Open(ref, write);
+}
+
+void CAuFileIO::Close()
+{
+    mFile.reset();
+}
+
+void CAuFileIO::CloseFileAndInit()
+{
+    Init();
+}
+
+std::int32_t CAuFileIO::CreateAndOpen(const CFileRef& ref, long, int channels, int bits, long sampleRate, long fileType,
+                                      const platform::FileHandle*)
+{
+    if (!ref.URL() || channels <= 0 || bits <= 0)
+        return kStatusParameterError;
+    const auto type = static_cast<FourCC>(fileType);
+    const StreamDescription format = newDataFormat(channels, bits, sampleRate, type);
+    std::int32_t status = kStatusOK;
+    auto file = AudioFile::create(*ref.URL(), type, format, &status);
+    if (!file)
+        return status;
+    ResetCounts();
+    mFile = std::move(file);
+    mDataFormat = format;
+    mFileRef = ref;
+    mFileType = type;
+    mOpenMode = kReadWrite;
+    return kStatusOK;
+}
+
+std::int32_t CAuFileIO::CreateAndOpen(const platform::URLRef& url, long reserved, int channels, int bits,
+                                      long sampleRate, long fileType, const platform::FileHandle* handle)
+{
+    return CreateAndOpen(CFileRef(url), reserved, channels, bits, sampleRate, fileType, handle);
+}
+
+unsigned int CAuFileIO::SampleRate() const
+{
+    constexpr double limit = 4294967296.0;
+    const double rate = mDataFormat.sampleRate;
+    return rate >= 0 && rate < limit ? static_cast<unsigned int>(rate) : 0;
+}
+
+std::int64_t CAuFileIO::NumFrames() const
+{
+    return mDataFormat.isLinearPCM() ? BytesToFrames(mAudioByteCount)
+                                     : static_cast<std::int64_t>(mDataFormat.framesPerPacket * mPacketCount);
+}
+
+std::int64_t CAuFileIO::FramesToBytes(long frames) const
+{
+    return BytesPerSample() * mDataFormat.channelsPerFrame * frames;
+}
+
+std::int64_t CAuFileIO::BytesToFrames(unsigned long long bytes) const
+{
+    const std::int64_t frame = BytesPerSample() * mDataFormat.channelsPerFrame;
+    return frame > 0 ? static_cast<std::int64_t>(bytes / static_cast<unsigned long long>(frame)) : 0;
+}
+
+bool CAuFileIO::Swapped() const
+{
+    return mDataFormat.bitsPerChannel == 8 ? mFileType == kWAVE
+                                           : (mDataFormat.formatFlags & StreamDescription::isBigEndian) != 0;
+}
+
+// Chunks, each the first item of user data with its id.
+
+int CAuFileIO::FindChunk(long id, CChunkData& chunk)
+{
+    if (mOpenMode < 0)
+        return kNotOpen;
+    const auto type = static_cast<FourCC>(id);
+    std::uint32_t size = 0;
+    if (!mFile || mFile->userDataSize(type, 0, size) != kStatusOK || size == 0)
+        return kNoItem;
+    std::unique_ptr<char[]> data(new (std::nothrow) char[size]);
+    const bool isRead = data && mFile->userData(type, 0, size, data.get()) == kStatusOK && size != 0;
+    chunk.data = isRead ? std::move(data) : nullptr;
+    chunk.size = isRead ? size : 0;
+    chunk.position = chunk.next = isRead ? -1 : 0;
+    if (!isRead)
+        return kItemUnreadable;
+    chunk.id = type;
+    return kFound;
+}
+
+int CAuFileIO::AddChunk(CChunkData& chunk, unsigned char)
+{
+    if (!IsWritable() || chunk.size < 0 || chunk.size > std::int64_t{UINT32_MAX})
+        return kNotOpen;
+    const auto size = static_cast<std::uint32_t>(chunk.size);
+    return mFile->setUserData(chunk.id, 0, size, chunk.data.get()) == kStatusOK ? kAdded : kNotOpen;
+}
+
+std::int32_t CAuFileIO::RemoveChunk(long id)
+{
+    return IsWritable() ? mFile->removeUserData(static_cast<FourCC>(id), 0) : kNotOpen;
+}
+
+bool CAuFileIO::IsVireoLoop()
+{
+    CChunkData chunk;
+    return FindChunk(tagging::kBasicTagging, chunk) == kFound;
+}
+
+void CAuFileIO::ByteOrder(int& value) const
+{
+    reverseUnlessWAVE(mFileType, value);
+}
+
+void CAuFileIO::ByteOrder(short& value) const
+{
+    reverseUnlessWAVE(mFileType, value);
+}
+
+void CAuFileIO::ByteOrder(unsigned int& value) const
+{
+    reverseUnlessWAVE(mFileType, value);
+}
+
+void CAuFileIO::ByteOrder(unsigned short& value) const
+{
+    reverseUnlessWAVE(mFileType, value);
+}

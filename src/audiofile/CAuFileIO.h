@@ -1,0 +1,99 @@
+// CAuFileIO is the older audio-file class: linear PCM only, in whatever container the audio-file service opens, as
+// 32-bit floats; the suite's chunks are user data of the service. CAudioFileIO does the container work itself.
+#pragma once
+
+#include "audiofile/CChunkData.h"
+#include "files/CFileRef.h"
+#include "platform/AudioFileService.h"
+#include "platform/FileSystem.h"
+
+#include <cstdint>
+#include <memory>
+
+/// Owns the file that it has open. Results are 0 or a status, unless stated otherwise; those of reading and writing are
+/// kStatusNotOpen when nothing is open. Frames are counted from 0, samples are interleaved.
+class KT_EXPORT CAuFileIO {
+public:
+    enum : std::int32_t { kClosed = -1, kReadOnly = 1, kReadWrite = 3 }; // the open mode
+
+    CAuFileIO();
+    CAuFileIO(int& status, const CFileRef& ref, unsigned char write);
+    ~CAuFileIO();
+    CAuFileIO(const CAuFileIO&) = delete;
+    CAuFileIO& operator=(const CAuFileIO&) = delete;
+
+    /// Opens the reference's file. 0 at once when it is open so already. -208 for data that is not linear PCM, and then
+    /// all but the reference is as in a new object; when the service cannot open the file, the mode stays the wanted
+    /// one.
+    std::int32_t Open(unsigned char write);
+    std::int32_t Open(const CFileRef& ref, unsigned char write);
+    std::int32_t Open(const platform::FileHandle* handle, unsigned char write);
+    /// Closes the file; the mode, format and counts stay.
+    void Close();
+    /// Closes the file, and makes all but the reference as in a new object.
+    void CloseFileAndInit();
+    /// Creates a file of linear PCM and has it open for reading and writing. "WAVE" is little-endian, every other type
+    /// big-endian; 32 bits are floats, which AIFF cannot hold. The second and the last parameter are not used. On
+    /// failure nothing changes, and a file that exists is a failure.
+    std::int32_t CreateAndOpen(const CFileRef& ref, long, int channels, int bits, long sampleRate, long fileType,
+                               const platform::FileHandle*);
+    std::int32_t CreateAndOpen(const platform::URLRef& url, long, int channels, int bits, long sampleRate,
+                               long fileType, const platform::FileHandle*);
+
+    const CFileRef& FileRef() const { return mFileRef; }
+    std::int32_t OpenMode() const { return mOpenMode; }
+    const platform::StreamDescription& DataFormat() const { return mDataFormat; }
+    unsigned int NumChannels() const { return mDataFormat.channelsPerFrame; }
+    unsigned int BitDepth() const { return mDataFormat.bitsPerChannel; }
+    FourCC FileType() const { return mFileType; }
+    unsigned int SampleRate() const;
+    /// As counted when the file was opened: writing does not change it. 0 for samples of less than a byte.
+    std::int64_t NumFrames() const;
+    std::int64_t FramesToBytes(long frames) const;
+    std::int64_t BytesToFrames(unsigned long long bytes) const;
+    /// Whether samples are big-endian; of 8-bit data whether they are unsigned, as in "WAVE".
+    bool Swapped() const;
+
+    /// Reads `frames` frames to `dest` and sets `frames` to how many there were. On failure, which includes that there
+    /// was none, the whole range of `dest` is zero and `frames` stays.
+    std::int32_t ReadFloat(float* dest, long startFrame, long& frames);
+    /// -54 unless the file is open for writing; -50 without `src`.
+    std::int32_t WriteFloat(float* src, long startFrame, long frames);
+    /// Writes samples in the processor's byte order. Kept: where the file's is the other one, those at `data` are
+    /// swapped in place, and left so. -1 without a bit depth.
+    std::int32_t WriteData(const void* data, long startFrame, long frames);
+
+    /// 1 found, -1 not open, -2 no such item, or an empty one, -3 unreadable. The chunk's positions are -1 when it was
+    /// found.
+    int FindChunk(long id, CChunkData& chunk);
+    /// Adds or replaces an item: 1, or -1. The second parameter is not used.
+    int AddChunk(CChunkData& chunk, unsigned char);
+    /// -1 when the file is not open for writing.
+    std::int32_t RemoveChunk(long id);
+    bool IsVireoLoop();
+
+    /// Reverse the bytes of the value unless the file type is "WAVE".
+    void ByteOrder(int& value) const;
+    void ByteOrder(short& value) const;
+    void ByteOrder(unsigned int& value) const;
+    void ByteOrder(unsigned short& value) const;
+
+private:
+    void Init();
+    void ResetCounts();
+    bool IsWritable() const { return mFile && mOpenMode == kReadWrite; }
+    std::int32_t ReadDescription();
+    std::int64_t BytesPerSample() const { return mDataFormat.bitsPerChannel / 8; }
+    platform::SampleFormat FileSamples() const;
+    /// Whether frames stand in the file as the sample format and the number of channels say.
+    bool HasPackedSamples() const;
+    std::int32_t ReadSamples(float* dest, std::int64_t startFrame, std::int64_t& frames);
+
+    CFileRef mFileRef;
+    std::unique_ptr<platform::AudioFile> mFile;
+    platform::StreamDescription mDataFormat;
+    std::uint64_t mAudioByteCount;
+    std::uint64_t mPacketCount;
+    FourCC mFileType;
+    std::int32_t mOpenMode;
+};

@@ -1,0 +1,130 @@
+// The samples of CAuFileIO: in pieces, so that a file of any size costs the same memory.
+#include "audiofile/CAuFileIO.h"
+
+#include "platform/SampleConversion.h"
+#include "platform/core/Status.h"
+
+#include <algorithm>
+#include <array>
+#include <cstddef>
+#include <limits>
+#include <memory>
+#include <new>
+
+namespace {
+
+constexpr std::int32_t kNoWriteAccess = -54;
+constexpr std::int32_t kNoBitDepth = -1;
+
+constexpr std::int64_t kMaxPackets = std::numeric_limits<std::uint32_t>::max(); // and bytes, of one call
+
+using Piece = std::array<std::byte, 64 * 1024>;
+
+} // namespace
+
+/// Kept: 8-bit samples go by the container, not by what the format says of their sign.
+platform::SampleFormat CAuFileIO::FileSamples() const
+{
+    const int bits = static_cast<int>(std::min<std::int64_t>(BytesPerSample(), 16)) * 8;
+    const bool isSwapped = Swapped();
+    return {.bits = bits,
+            .isFloat = (mDataFormat.formatFlags & platform::StreamDescription::isFloat) != 0,
+            .isUnsigned = bits == 8 && isSwapped,
+            .order = isSwapped && bits != 8 ? std::endian::big : std::endian::little};
+}
+
+bool CAuFileIO::HasPackedSamples() const
+{
+    return FileSamples().isSupported() && mDataFormat.channelsPerFrame > 0 &&
+           BytesPerSample() * mDataFormat.channelsPerFrame == mDataFormat.bytesPerPacket;
+}
+
+/// By bytes, as a frame of many channels may be longer than a piece.
+std::int32_t CAuFileIO::ReadSamples(float* dest, std::int64_t startFrame, std::int64_t& frames)
+{
+    if (!mFile)
+        return kStatusNotOpen;
+    if (!HasPackedSamples())
+        return platform::AudioHandle::kFormatNotSupported;
+    std::uint64_t there = 0;
+    if (const std::int32_t status = mFile->audioDataPacketCount(there); status != kStatusOK)
+        return status;
+    const auto start = static_cast<std::uint64_t>(startFrame);
+    if (start >= there && frames > 0)
+        return kStatusEndOfFile;
+    frames = static_cast<std::int64_t>(std::min<std::uint64_t>(static_cast<std::uint64_t>(frames), there - start));
+
+    const platform::SampleFormat format = FileSamples();
+    const auto sampleSize = static_cast<std::uint64_t>(format.bytesPerSample());
+    const std::uint64_t position = start * mDataFormat.bytesPerPacket;
+    const std::uint64_t samples = static_cast<std::uint64_t>(frames) * mDataFormat.channelsPerFrame;
+    Piece piece;
+    for (std::uint64_t done = 0; done < samples;) {
+        const std::uint64_t count = std::min<std::uint64_t>(samples - done, piece.size() / sampleSize);
+        auto bytes = static_cast<std::uint32_t>(count * sampleSize);
+        if (const std::int32_t status = mFile->readBytes(position + done * sampleSize, bytes, piece.data());
+            status != kStatusOK)
+            return status;
+        if (bytes != count * sampleSize) // another cut the file meanwhile
+            return kStatusEndOfFile;
+        platform::samplesToFloat(piece.data(), format, dest + done, static_cast<std::size_t>(count));
+        done += count;
+    }
+    return kStatusOK;
+}
+
+std::int32_t CAuFileIO::ReadFloat(float* dest, long startFrame, long& frames)
+{
+    if (dest == nullptr || startFrame < 0 || frames < 0)
+        return kStatusParameterError;
+    std::int64_t read = frames;
+    const std::int32_t status = ReadSamples(dest, startFrame, read);
+    if (status == kStatusOK)
+        frames = static_cast<long>(read);
+    else
+        std::fill_n(dest, static_cast<std::size_t>(frames) * mDataFormat.channelsPerFrame, 0.0F);
+    return status;
+}
+
+std::int32_t CAuFileIO::WriteFloat(float* src, long startFrame, long frames)
+{
+    if (mOpenMode != kReadWrite)
+        return kNoWriteAccess;
+    if (src == nullptr || startFrame < 0 || frames < 0 || frames > kMaxPackets)
+        return kStatusParameterError;
+    if (!mFile)
+        return kStatusNotOpen;
+    if (!HasPackedSamples())
+        return platform::AudioHandle::kFormatNotSupported;
+    const platform::SampleFormat format = FileSamples();
+    const auto samples = static_cast<std::size_t>(frames) * mDataFormat.channelsPerFrame;
+    std::size_t size = 0;
+    std::unique_ptr<std::byte[]> scratch;
+    if (!__builtin_mul_overflow(samples, static_cast<std::size_t>(format.bytesPerSample()), &size))
+        scratch.reset(new (std::nothrow) std::byte[size]);
+    if (!scratch)
+        return kStatusOutOfMemory;
+    platform::floatToSamples(src, format, scratch.get(), samples);
+    auto packets = static_cast<std::uint32_t>(frames);
+    return mFile->writePackets(static_cast<std::uint64_t>(startFrame), packets, scratch.get());
+}
+
+std::int32_t CAuFileIO::WriteData(const void* data, long startFrame, long frames)
+{
+    const std::uint32_t bits = mDataFormat.bitsPerChannel, channels = mDataFormat.channelsPerFrame;
+    if (bits < 1)
+        return kNoBitDepth;
+    const std::int64_t sampleSize = (std::int64_t{bits} + 7) / 8;
+    std::int64_t size = 0, start = 0;
+    if (data == nullptr || startFrame < 0 || frames < 0 ||
+        __builtin_mul_overflow(sampleSize * channels, frames, &size) || size > kMaxPackets ||
+        __builtin_mul_overflow(sampleSize * channels, startFrame, &start))
+        return kStatusParameterError;
+    if (Swapped()) // the caller's samples stay swapped: callers of old count on it
+        platform::swapSamples(const_cast<void*>(data), static_cast<int>(sampleSize),
+                              static_cast<std::size_t>(frames) * channels);
+    if (!mFile)
+        return kStatusNotOpen;
+    auto bytes = static_cast<std::uint32_t>(size);
+    return mFile->writeBytes(static_cast<std::uint64_t>(start), bytes, data);
+}

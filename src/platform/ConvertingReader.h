@@ -1,0 +1,99 @@
+// The converting reader: the frames of an audio file in the format that its caller wants. Linear PCM in WAVE, RF64,
+// BW64, AIFF, AIFC and CAF is read by the library itself, everything else by a module that is loaded when the first
+// such file is met (platform/audio/DecoderModule.h).
+#pragma once
+
+#include "platform/AudioFileService.h"
+#include "platform/AudioHandle.h"
+#include "platform/URL.h"
+#include "platform/core/Error.h"
+
+#include <cstdint>
+#include <memory>
+#include <span>
+
+namespace platform {
+
+class AudioDecoder;
+
+/// One destination of frames: `byteSize` bytes at `data`.
+struct AudioBuffer {
+    std::uint32_t channels = 0; // interleaved
+    std::uint32_t byteSize = 0; // in: room; out: bytes read
+    void* data = nullptr;
+};
+
+/// The frames of a decoded file that are sound; encoders put `priming` frames ahead of them and `remainder` behind.
+struct PacketTable {
+    std::int64_t validFrames = 0;
+    std::int32_t primingFrames = 0;
+    std::int32_t remainderFrames = 0;
+};
+static_assert(sizeof(PacketTable) == 16);
+
+/// Which channel is where: a tag, and with tag 0 a description for each channel, of which the first is here.
+struct ChannelLayout {
+    static constexpr std::uint32_t byDescriptions = 0;
+    static constexpr std::uint32_t byBitmap = 0x10000; // every other tag counts its channels in its low 16 bits
+
+    struct Description {
+        std::uint32_t label = 0;
+        std::uint32_t flags = 0;
+        float coordinates[3] = {};
+    };
+
+    std::uint32_t tag = 0;
+    std::uint32_t bitmap = 0;
+    std::uint32_t descriptionCount = 0;
+    Description descriptions[1];
+};
+static_assert(sizeof(ChannelLayout) == 32);
+
+/// A file open for reading, with a place in it, a frame. Owns the file. Operations return 0 or a negative status; one
+/// that fails leaves the place where it was. Reading allocates nothing.
+class KT_EXPORT ConvertingReader final : public AudioHandle {
+public:
+    static constexpr std::int32_t kPropertyNotSupported = -66561;
+    static constexpr std::int32_t kInvalidDataFormat = -66566;
+
+    static constexpr FourCC fileFormatProperty = fourCC("ffmt");   // StreamDescription
+    static constexpr FourCC clientFormatProperty = fourCC("cfmt"); // StreamDescription; can be set
+    static constexpr FourCC clientLayoutProperty = fourCC("cclo"); // ChannelLayout, of any length; can be set
+    static constexpr FourCC frameCountProperty = fourCC("#frm");   // 64-bit
+    static constexpr FourCC audioFileProperty = fourCC("afil");   // AudioHandle*, the reader's; null when there is none
+    static constexpr FourCC packetTableProperty = fourCC("xpti"); // PacketTable; not of linear PCM
+
+    /// Null, with `*status` and `*error` (either may be null), when the file cannot be opened; kFormatNotSupported for
+    /// audio that nothing here decodes, and then the error says what to install.
+    static std::unique_ptr<ConvertingReader> open(const URL& url, std::int32_t* status, Error* error = nullptr);
+    ~ConvertingReader() override;
+
+    /// How the file holds its audio.
+    const StreamDescription& fileFormat() const;
+    /// What read() gives. At first linear PCM as near to the file's own as it can be.
+    const StreamDescription& clientFormat() const;
+    /// Interleaved, packed linear PCM of any supported sample and channel count, at the file's sample rate; else
+    /// kFormatNotSupported. Samples of another kind go by way of 32-bit floats. Other channel counts: one channel goes
+    /// to all, all are averaged to one, else surplus channels are left out and missing ones silent. Drops the layout.
+    std::int32_t setClientFormat(const StreamDescription& format);
+    std::uint64_t frameCount() const;
+
+    /// kStatusBeforeStart below 0; a place past the end is one where nothing is read.
+    std::int32_t seek(std::int64_t frame);
+    /// Reads into one buffer of all channels, and sets `frames` to how many were read: fewer than asked only at the end
+    /// of the file or of the buffer's room, and none at the end. On failure none.
+    std::int32_t read(std::uint32_t& frames, std::span<AudioBuffer> buffers);
+
+    /// kPropertyNotSupported for other ids, and for what the file does not have.
+    std::int32_t propertyInfo(FourCC id, std::uint32_t& size, bool& isWritable) override;
+    std::int32_t property(FourCC id, std::uint32_t& size, void* data) override;
+    std::int32_t setProperty(FourCC id, std::uint32_t size, const void* data) override;
+
+private:
+    struct Implementation;
+    explicit ConvertingReader(std::unique_ptr<Implementation> implementation);
+    std::int32_t setLayout(BytesView layout);
+    std::unique_ptr<Implementation> implementation_;
+};
+
+} // namespace platform

@@ -1,0 +1,97 @@
+// A file of a coding that only a module decodes, as far as the tests need one: frame n holds n, and n + 0.5 on the
+// second channel. Gives at most 7 frames a call, as decoders of packets do.
+#pragma once
+
+#include "platform/audio/AudioDecoder.h"
+#include "platform/audio/DecoderModule.h"
+#include "platform/core/Status.h"
+
+#include <algorithm>
+#include <optional>
+
+class FakeDecoder final : public platform::AudioDecoder {
+public:
+    struct File {
+        FourCC formatId = fourCC(".mp3");
+        FourCC fileType = fourCC("MPG3");
+        std::uint64_t frames = 1000;
+        std::optional<std::int64_t> validFrames; // of the packet table
+        bool hasFile = true;
+        int seeks = 0;                            // done so far
+        int failingSeek = 0;                      // the number of the one that fails
+        std::uint64_t broken = ~std::uint64_t{0}; // a frame that cannot be read
+    };
+
+    /// While it lives, files that are no linear PCM are opened as `file`.
+    class Module {
+    public:
+        explicit Module(File& file)
+        {
+            opened = &file;
+            platform::decoderOpener() = [](const char*, std::int32_t*) -> platform::AudioDecoder* {
+                return new FakeDecoder(*opened);
+            };
+        }
+        ~Module() { platform::decoderOpener() = nullptr; }
+
+    private:
+        static inline File* opened;
+    };
+
+    explicit FakeDecoder(File& file) : file_(file), handle_(file.fileType)
+    {
+        format_ = platform::StreamDescription::packedPCM(44100, 2, {.bits = 32, .isFloat = true});
+        fileFormat_.formatId = file.formatId;
+        fileFormat_.sampleRate = 44100;
+        fileFormat_.channelsPerFrame = 2;
+    }
+    const platform::StreamDescription& fileFormat() const override { return fileFormat_; }
+    const platform::StreamDescription& frameFormat() const override { return format_; }
+    std::uint64_t frameCount() const override { return file_.frames; }
+    platform::AudioHandle* file() override { return file_.hasFile ? &handle_ : nullptr; }
+    bool packetTable(platform::PacketTable& table) const override
+    {
+        table.validFrames = file_.validFrames.value_or(0);
+        return file_.validFrames.has_value();
+    }
+    std::int32_t seek(std::uint64_t frame) override
+    {
+        if (++file_.seeks == file_.failingSeek)
+            return kStatusIOError;
+        frame_ = frame;
+        return kStatusOK;
+    }
+    std::int32_t read(std::uint32_t& frames, void* to) override
+    {
+        frames = static_cast<std::uint32_t>(
+            std::min<std::uint64_t>({frames, 7, file_.frames - std::min(frame_, file_.frames)}));
+        for (std::uint32_t i = 0; i < frames; ++i, ++frame_) {
+            if (frame_ == file_.broken)
+                return kStatusIOError;
+            static_cast<float*>(to)[2 * i] = static_cast<float>(frame_);
+            static_cast<float*>(to)[2 * i + 1] = static_cast<float>(frame_) + 0.5F;
+        }
+        return kStatusOK;
+    }
+
+private:
+    /// Knows its type, and takes no property.
+    class Handle final : public platform::AudioHandle {
+    public:
+        explicit Handle(FourCC type) : AudioHandle(Kind::file), type_(type) {}
+        std::int32_t propertyInfo(FourCC, std::uint32_t&, bool&) override { return -1; }
+        std::int32_t property(FourCC id, std::uint32_t& size, void* data) override
+        {
+            return id == platform::AudioFile::fileTypeProperty ? give(&type_, sizeof type_, size, data) : -1;
+        }
+        std::int32_t setProperty(FourCC, std::uint32_t, const void*) override { return -1; }
+
+    private:
+        FourCC type_;
+    };
+
+    File& file_;
+    Handle handle_;
+    platform::StreamDescription fileFormat_, format_;
+    std::uint64_t frame_ = 0;
+};

@@ -11,6 +11,7 @@
 #include <cstdio>
 #include <filesystem>
 #include <mutex>
+#include <system_error>
 #include <thread>
 #include <unistd.h>
 
@@ -41,7 +42,13 @@ private:
 std::unique_ptr<WaitNotice> noticeOf(const std::string& path, const platform::CoordinatedItem& item, bool isWriting,
                                      bool quiet)
 {
-    return quiet || !isTerminal(STDERR_FILENO) ? nullptr : std::make_unique<WaitNotice>(path, item, isWriting);
+    if (quiet || !isTerminal(STDERR_FILENO))
+        return nullptr;
+    try {
+        return std::make_unique<WaitNotice>(path, item, isWriting);
+    } catch (const std::system_error&) { // no thread: the wait is not told
+        return nullptr;
+    }
 }
 
 } // namespace

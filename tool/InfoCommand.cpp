@@ -3,6 +3,7 @@
 #include "CommandLine.h"
 #include "Failure.h"
 #include "FileAccess.h"
+#include "FileByFile.h"
 #include "FileFacts.h"
 #include "InputFile.h"
 #include "Table.h"
@@ -183,20 +184,7 @@ private:
 bool runInfo(const std::vector<std::string>& files, bool isLong, const OutputOptions& options)
 {
     InfoWriter writer(options, isLong);
-    bool good = true;
-    for (const std::string& path : files) {
-        if (Output::standard().failed())
-            break;
-        try {
-            writer.add(path, describe(path, options.quiet));
-        } catch (const Failure& failure) {
-            good = false;
-            writer.addFailure(path, failure.what());
-            reportFailure(path, failure.what());
-        }
-    }
-    writer.finish();
-    return good;
+    return writeFileByFile(writer, files, [&](const std::string& path) { return describe(path, options.quiet); });
 }
 
 void declareInfo(CommandLine& commandLine)

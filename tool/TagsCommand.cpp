@@ -3,6 +3,7 @@
 #include "CommandLine.h"
 #include "Failure.h"
 #include "FileAccess.h"
+#include "FileByFile.h"
 #include "LoopTags.h"
 
 #include <nlohmann/json.hpp>
@@ -76,21 +77,10 @@ private:
 bool runTags(const std::vector<std::string>& files, const OutputOptions& options)
 {
     TagsWriter writer(options, files.size() > 1);
-    bool good = true;
-    for (const std::string& path : files) {
-        if (Output::standard().failed())
-            break;
-        try {
-            const FileAccess access = accessForReading(path, options.quiet);
-            writer.add(path, readLoopTags(path));
-        } catch (const Failure& failure) {
-            good = false;
-            writer.addFailure(path, failure.what());
-            reportFailure(path, failure.what());
-        }
-    }
-    writer.finish();
-    return good;
+    return writeFileByFile(writer, files, [&](const std::string& path) {
+        const FileAccess access = accessForReading(path, options.quiet);
+        return readLoopTags(path);
+    });
 }
 
 void declareTags(CommandLine& commandLine)

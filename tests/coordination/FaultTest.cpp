@@ -181,8 +181,11 @@ TEST_F(FaultTest, WithoutDescriptorsTheErrorSaysSo)
     EXPECT_EQ(poor.expectStart("p error").substr(0, 10), "p error " + std::to_string(EMFILE));
     poor.tell("l presenterlock 0 " + item());
     poor.tell("l retain");
-    for (std::string state; state != "l count 0"; state = poor.expectStart("l count"))
+    for (std::string state; state != "l count 0";) {
         poor.tell("l state");
+        state = poor.expectStart("l count");
+        ASSERT_FALSE(state.empty());
+    }
     writer.tell("w write " + item()); // nothing was left behind
     EXPECT_TRUE(writer.expect("w in"));
 }

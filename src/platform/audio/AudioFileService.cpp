@@ -70,8 +70,9 @@ StreamDescription StreamDescription::packedPCM(double sampleRate, std::uint32_t 
     return format;
 }
 
-AudioFile::AudioFile(std::unique_ptr<Implementation> implementation) :
-    AudioHandle(Kind::file), implementation_(std::move(implementation))
+AudioFile::AudioFile(std::unique_ptr<Implementation> implementation)
+    : AudioHandle(Kind::file),
+      implementation_(std::move(implementation))
 {
 }
 AudioFile::~AudioFile() = default;

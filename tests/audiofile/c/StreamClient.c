@@ -1,5 +1,5 @@
-/* A C program that reads an audio file through the stream interface: StreamClient AUDIO_FILE OTHER_FILE. The second is a
- * file that is no audio. Exits with the number of the check that failed. */
+/* A C program that reads an audio file through the stream interface: StreamClient AUDIO_FILE OTHER_FILE. The second is
+ * a file that is no audio. Exits with the number of the check that failed. */
 #include "audiofile/XStream.h"
 
 #include <stddef.h>

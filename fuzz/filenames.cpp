@@ -99,7 +99,7 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
     constexpr std::size_t header = 4;
     if (size < header)
         return 0;
-    const std::size_t capacity = (data[1] | data[2] << 8) % 1100U;
+    const std::size_t capacity = static_cast<unsigned>(data[1] | data[2] << 8) % 1100U;
     const std::size_t extensionLength = std::min<std::size_t>(data[3], size - header);
     const char* texts = reinterpret_cast<const char*>(data + header);
     // C strings: a NUL ends them.

@@ -50,8 +50,9 @@ ReadDocument readDocument(const std::string& path, const AdmArguments& arguments
     read.document = std::make_unique<ADMDocument>(nullptr);
     read.document->setOptions(optionsFor(arguments));
     if (diagnose == Diagnose::yes)
-        read.document->setDiagnosticsHandler(
-            [&read](const ADMDiagnostic& diagnostic) { read.diagnostics.push_back(diagnostic); });
+        read.document->setDiagnosticsHandler([&read](const ADMDiagnostic& told) {
+            read.diagnostics.push_back({told.position, told.kind, shortened(told.elementID), told.text});
+        });
     Progress progress("reading", source.size(), quiet);
     std::uint64_t done = 0;
     read.document->setProgressHandler([&](std::uint64_t bytes) {

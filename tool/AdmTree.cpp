@@ -109,6 +109,7 @@ void AdmTree::showItem(const Item& item, bool isLast, std::size_t depth)
 void AdmTree::showAgain(const Item& item, bool isLast, State state)
 {
     AdmNode node = nodeOf(item);
+    node.name = shortened(node.name);
     node.details = {state == State::open     ? "goes round in a circle"
                     : state == State::putOff ? "goes on below"
                                              : "see above"};

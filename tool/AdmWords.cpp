@@ -173,7 +173,7 @@ void addImportance(Words& words, double importance, double usual)
 
 std::string nameAndID(const std::string& name, const std::string& id)
 {
-    return name.empty() ? id : name + " (" + id + ")";
+    return name.empty() ? shortened(id) : shortened(name) + " (" + shortened(id) + ")";
 }
 
 void addObjectBlock(Words& words, const ADMAudioBlockFormat_Object& block)
@@ -274,9 +274,9 @@ AdmNode describe(const ADMAudioTrackUID& track)
     AdmNode node{"track", "", track.audioTrackUIDID(), {}};
     const ADMAudioTrackFormat* format = track.audioTrackFormat();
     if (format != nullptr)
-        node.name = format->audioTrackFormatName();
+        node.name = shortened(format->audioTrackFormatName());
     else if (track.audioChannelFormat() != nullptr)
-        node.name = track.audioChannelFormat()->audioChannelFormatName();
+        node.name = shortened(track.audioChannelFormat()->audioChannelFormatName());
     if (track.sampleRate() != 0)
         node.details.push_back(fmt::format("{:.10g} kHz", static_cast<double>(track.sampleRate()) / 1000));
     if (track.bitDepth() != 0)
@@ -312,6 +312,16 @@ AdmNode describe(const ADMAudioBlockFormat& block)
     if (object != nullptr)
         addObjectBlock(words, *object);
     return node;
+}
+
+std::string shortened(const std::string& text)
+{
+    std::size_t size = 200;
+    if (text.size() <= size)
+        return text;
+    while (size > 0 && (static_cast<unsigned char>(text[size]) & 0xC0) == 0x80) // never within a character
+        --size;
+    return text.substr(0, size) + "…";
 }
 
 std::string countText(std::size_t count, std::string_view noun)

@@ -88,6 +88,14 @@ public:
         return usage + "\n";
     }
 
+    std::string make_help(const CLI::App* app, std::string name, CLI::AppFormatMode mode) const override
+    {
+        std::string help = CLI::Formatter::make_help(app, std::move(name), mode);
+        if (const std::size_t gap = help.find("\n\n\n"); gap != help.npos)
+            help.erase(gap, 1); // the group of words lists nothing, and has an empty line in front all the same
+        return help;
+    }
+
 private:
     static std::string usageLine(const CLI::App& app, const std::string& name)
     {

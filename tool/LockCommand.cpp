@@ -166,6 +166,11 @@ void awaitEndOfInput()
 int lockAndRun(const LockArguments& arguments, const OutputOptions& options)
 {
     const platform::URLRef url = coordinatedURL(arguments.file);
+    // Not taken for had: two commands under that lock, each with one of its own, would meet. Nor for reading: a writer
+    // that waits in between would hold back what it waits for.
+    if (const auto lock = lockAbove(url))
+        throw Failure(fmt::format("is locked by process {} already, which waits for this command; nothing was run",
+                                  lock->processID));
     // Nothing is read from it: `ktfiles locks` knows items by number alone, and finds the name of this one here.
     const Descriptor shown(::open(arguments.file.c_str(), O_PATH | O_CLOEXEC));
     Holder holder(arguments, url);

@@ -114,7 +114,7 @@ public:
     ADMElement* findADMElementRef(std::optional<std::string_view> identifier,
                                   std::optional<std::string_view> typePrefix) override
     {
-        if (document_.options_.silentTrack && identifier == "ATU_00000000")
+        if (document_.options_.silentTrack && typePrefix == kADMAudioTrackUIDPrefix && identifier == "ATU_00000000")
             return nullptr;
         try {
             return document_.findADMElementRef(identifier, typePrefix);

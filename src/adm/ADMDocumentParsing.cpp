@@ -139,14 +139,14 @@ void ADMDocument::push(std::unique_ptr<ADMElement> element, const XMLAttributes&
 
 void ADMDocument::beginBlock(const XMLAttributes& attributes)
 {
-    if (diagnosticsHandler_)
-        blockPosition_ = parser_->elementPosition();
     try {
         push(ADMAudioBlockFormat::audioBlockFormatWithAttributes(attributes), attributes);
+        if (diagnosticsHandler_)
+            blockPosition_ = parser_->elementPosition();
     } catch (const ADMException& problem) {
         if (!options_.skipUnsupportedBlocks || problem.name() != kADMExceptionUnsupportedDefinition)
             throw;
-        report(problem, std::string(attributes.find("audioBlockFormatID").value_or("")), blockPosition_);
+        report(problem, std::string(attributes.find("audioBlockFormatID").value_or("")), parser_->elementPosition());
         skippedDepth_ = 1;
     }
 }

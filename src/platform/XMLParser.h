@@ -74,8 +74,9 @@ public:
 
 /// One parse of one stream. Understood are UTF-8, UTF-16, US-ASCII and ISO-8859-1. Refused, beside what is not
 /// well-formed: declarations inside a DOCTYPE (and so every entity of a document's own), tags of more than 16 KiB, a
-/// depth of more than `kXMLMaximumDepth`, comments and CDATA sections of more than 10 MB, more than 256 namespaces that
-/// are in force at a time. Memory does not grow with the document.
+/// depth of more than `kXMLMaximumDepth`, comments and CDATA sections of more than 10 MB, as much white space around
+/// the root element, more than 256 namespaces that are in force at a time, more than 10,000 different names. Memory does
+/// not grow with the document.
 class KT_EXPORT XMLParser {
 public:
     /// Gets the number of bytes read so far, and returns false to cancel.
@@ -89,6 +90,9 @@ public:
 
     /// Called for each piece that is read, of 64 KiB at most.
     void setProgressHandler(ProgressHandler handler);
+    /// How many elements may be open at a time, instead of `kXMLMaximumDepth`. A greater depth lifts the limit of
+    /// comments and CDATA sections too, which is one with the library's own.
+    void setMaximumDepth(int depth);
 
     /// True for a well-formed document. Else false with `error`: of the domain `kXMLErrorDomain` with "line" and
     /// "column" in its user information; or of `ErrorDomain::status`, with the stream's code or kStatusUserCancelled.

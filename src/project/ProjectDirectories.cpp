@@ -81,10 +81,10 @@ bool isPackageKind(ProjectDirectoryType type)
            type == kProjectDirectoryConcert;
 }
 
-bool contains(const CFileRef& folder, const char* name)
+std::string pathIn(const CFileRef& folder, const char* name)
 {
     const char* path = folder.GetPath();
-    return path != nullptr && itemExists(std::string(path) + '/' + name);
+    return path != nullptr ? std::string(path) + '/' + name : "";
 }
 
 const char* olderName(ProjectDirectoryType type, std::size_t wanted)
@@ -128,14 +128,15 @@ ProjectDirectoryType GetProjectDirectoryType(const CFileRef& project)
     if (equalIgnoringASCIICase(extension, "fuguex"))
         return kProjectDirectoryPackage;
     if (equalIgnoringASCIICase(extension, "band"))
-        return project.Exists() && !contains(project, ProjectLayout::alternatives.front()) ? kProjectDirectoryOldBand
-                                                                                           : kProjectDirectoryBand;
+        return project.Exists() && !folderExists(pathIn(project, ProjectLayout::alternatives.front()))
+                   ? kProjectDirectoryOldBand
+                   : kProjectDirectoryBand;
     if (equalIgnoringASCIICase(extension, "mwand"))
         return kProjectDirectoryMwand;
     if (equalIgnoringASCIICase(extension, "grid"))
         return kProjectDirectoryGrid;
     if (equalIgnoringASCIICase(extension, "concert"))
-        return contains(project, "isProject") ? kProjectDirectoryConcertProject : kProjectDirectoryConcert;
+        return itemExists(pathIn(project, "isProject")) ? kProjectDirectoryConcertProject : kProjectDirectoryConcert;
     return kProjectDirectoryPlain;
 }
 

@@ -65,8 +65,8 @@ bool ProjectMediaPaths::makeAbsolute(std::string_view stored, std::string& resul
         stored.remove_prefix(inside);
         result = package_;
     } else if (stored.front() == '/') {
-        stored.remove_prefix(1);
-        result = "/";
+        result = stored; // as it is: standardized by its text it could lead past a link to another file
+        return true;
     } else {
         result = mediaBase_;
         const bool hasPrefix = stored.starts_with(kMediaPrefix);

@@ -2,45 +2,11 @@
 
 #include <gtest/gtest.h>
 
-#include <functional>
+#include <ctime>
 
 using platform::XMLAttributes;
 
 namespace {
-
-ADMAudioTrackFormat trackFormat()
-{
-    return ADMAudioTrackFormat({{"audioTrackFormatID", "AT_00010001_01"}, {"audioTrackFormatName", "T"}});
-}
-
-TEST(ADMElements, DefaultsOfWhatIsNotGiven)
-{
-    const ADMAudioProgramme programme({{"audioProgrammeID", "APR_100F"}, {"audioProgrammeName", "P"}, {"start", ""}});
-    EXPECT_EQ(programme.index(), 0x100FU);
-    EXPECT_EQ(programme.start(), 0);
-    EXPECT_EQ(programme.end(), kADMInvalidTime);
-    EXPECT_EQ(programme.maxDuckingDepth(), 0);
-    EXPECT_FALSE(programme.audioProgrammeLanguage());
-
-    const ADMAudioContent content({{"audioContentID", "ACO_1001"}, {"audioContentName", "C"}});
-    EXPECT_EQ(content.dialogueMode(), 2);
-    EXPECT_EQ(content.dialogueContentKind(), 0);
-
-    const ADMAudioObject object({{"audioObjectID", "no ID at all"}, {"audioObjectName", "O"}});
-    EXPECT_EQ(object.start(), 0);
-    EXPECT_EQ(object.duration(), kADMInvalidTime);
-    EXPECT_EQ(object.dialogueMode(), 2);
-    EXPECT_EQ(object.importance(), 10);
-    EXPECT_FALSE(object.interact() || object.disallowDucking() || object.headLocked() || object.mute());
-    EXPECT_EQ(object.gain(), 1);
-    EXPECT_EQ(object.gainUnit(), 0);
-    EXPECT_EQ(object.polarOffset(), ADMPolarOffset());
-
-    const ADMAudioTrackUID uid({{"UID", "atu_0000000a"}});
-    EXPECT_EQ(uid.index(), 10U);
-    EXPECT_EQ(uid.sampleRate(), 0);
-    EXPECT_FALSE(uid.audioTrackFormatIDRef() || uid.audioTrackFormat() != nullptr);
-}
 
 TEST(ADMElements, NumbersAndFlagsOfAttributes)
 {
@@ -70,123 +36,46 @@ TEST(ADMElements, FloatsReadAlikeByEitherRoad)
         return object.gain();
     };
     const float infinity = std::numeric_limits<float>::infinity();
-    const struct {
-        std::string_view text;
-        float value;
-    } rows[] = {
-        {"-30.000000", -30},
-        {"0.707107", 0.707107F},
-        {" +1.5e-3 x", 0.0015F},
-        {".5", 0.5F},
-        {"5.", 5},
-        {"", 0},
-        {"loud", 0},
-        {"-inf", 0},
-        {"nan", 0},
-        {"0x10", 0},
-        {"--1", 0},
-        {"1e50", infinity},
-        {"-1e999", -infinity},
-        {"1e-999", 0},
-        {"-", 0},
-        {"179.9000000", 179.9F},
-        {"123.456789", 123.456789F},
-        {"16777217", 16777217.0F},
-        {"0.1.2", 0.1F},
-    };
-    for (const auto& row : rows)
-        EXPECT_EQ(gain(row.text), row.value) << row.text;
+    const std::pair<std::string_view, float> rows[] = {{"-30.000000", -30},
+                                                       {"0.707107", 0.707107F},
+                                                       {" +1.5e-3 x", 0.0015F},
+                                                       {".5", 0.5F},
+                                                       {"5.", 5},
+                                                       {"", 0},
+                                                       {"loud", 0},
+                                                       {"-inf", 0},
+                                                       {"nan", 0},
+                                                       {"0x10", 0},
+                                                       {"--1", 0},
+                                                       {"1e50", infinity},
+                                                       {"-", 0},
+                                                       {"-1e999", -infinity},
+                                                       {"1e-999", 0},
+                                                       {"179.9000000", 179.9F},
+                                                       {"123.456789", 123.456789F},
+                                                       {"16777217", 16777217.0F},
+                                                       {"0.1.2", 0.1F}};
+    for (const auto& [text, value] : rows)
+        EXPECT_EQ(gain(text), value) << text;
     for (std::int64_t i = 0; i < 20000; ++i) { // against the C library
         const std::string text = std::to_string(i * 7919 % 1000) + "." + std::to_string(i * 104729 % 1000003);
         ASSERT_EQ(gain(text), std::strtof(text.c_str(), nullptr)) << text;
     }
 }
 
-TEST(ADMElements, WhatIsRaised)
-{
-    const struct {
-        std::function<void()> make;
-        const char* problem;
-    } rows[] = {
-        {[] {
-             ADMAudioProgramme({{"audioProgrammeID", "ACO_1001"}, {"audioProgrammeName", "P"}});
-         },
-         "WrongIDPrefix: prefix 'ACO' is not a valid prefix for audioProgramme"},
-        {[] {
-             ADMAudioContent({{"audioContentID", "apr_1001"}, {"audioContentName", "C"}});
-         },
-         "WrongIDPrefix: prefix 'APR' is not a valid prefix for audioContent"},
-        {[] {
-             ADMAudioTrackUID({{"UID", "AO_1001"}});
-         },
-         "WrongIDPrefix: prefix 'AO' is not a valid prefix for audioTrackUID"},
-        {[] {
-             ADMAudioTrackUID({{"UID", "ATU_1"}});
-         },
-         "MalformedIDString: malformed identifier ATU_1"},
-        {[] {
-             ADMAudioObject({{"audioObjectID", ""}, {"audioObjectName", "O"}});
-         },
-         "MalformedDefinition: Required attribute 'audioObjectID' not found"},
-        {[] {
-             ADMAudioPackFormat({{"audioPackFormatID", "AP_1"}, {"audioPackFormatName", "P"}});
-         },
-         "MalformedDefinition: unsupported type for node AP_1"},
-        {[] {
-             ADMAudioStreamFormat(
-                 {{"audioStreamFormatID", "AS_7"}, {"audioStreamFormatName", "S"}, {"formatLabel", "0002"}});
-         },
-         "UnsupportedDefinition: unsupported data format 0002 found in AS_7"},
-        {[] {
-             ADMAudioStreamFormat(
-                 {{"audioStreamFormatID", "AS_7"}, {"audioStreamFormatName", "S"}, {"formatDefinition", "AAC"}});
-         },
-         "UnsupportedDefinition: unsupported data format FFFF found in AS_7"},
-    };
-    for (const auto& row : rows)
-        EXPECT_EQ(raised(row.make), row.problem);
-}
-
 TEST(ADMElements, GainUnitIsResetByEveryGain)
 {
     ADMAudioObject object({{"audioObjectID", "AO_1001"}, {"audioObjectName", "O"}});
-    object.setSubElement("gain", "-6", {{"gainUnit", "dB"}});
-    EXPECT_EQ(object.gain(), -6);
-    EXPECT_EQ(object.gainUnit(), 1);
-    object.setSubElement("gain", "0.5", {});
-    EXPECT_EQ(object.gainUnit(), 0);
-    object.setSubElement("gain", "0.5", {{"gainUnit", "db"}});
-    EXPECT_EQ(object.gainUnit(), 0);
-}
-
-TEST(ADMElements, OffsetsLabelsAndDialogue)
-{
-    ADMAudioObject object({{"audioObjectID", "AO_1001"}, {"audioObjectName", "O"}});
-    object.setSubElement("positionOffset", "1.5", {{"coordinate", "elevation"}});
-    object.setSubElement("positionOffset", "-2", {{"coordinate", "Z"}});
-    object.setSubElement("positionOffset", "3", {{"coordinate", "x"}});
-    object.setSubElement("positionOffset", "4", {});
-    EXPECT_EQ(object.polarOffset(), (ADMPolarOffset{0, 1.5, 0}));
-    EXPECT_EQ(object.cartesianOffset(), (ADMCartesianOffset{0, 0, -2}));
-    object.setSubElement("audioObjectLabel", "one", {{"language", "en"}});
-    object.setSubElement("audioObjectLabel", "none", {{"language", ""}});
-    object.setSubElement("audioObjectLabel", "two", {{"language", "en"}});
-    EXPECT_EQ(object.audioObjectLabels(), (ADMLabels{{"en", "two"}}));
-
-    ADMAudioContent content({{"audioContentID", "ACO_1001"}, {"audioContentName", "C"}});
-    content.setSubElement("dialogue", "1", {{"dialogueContentKind", "5"}, {"mixedContentKind", "x"}});
-    EXPECT_EQ(content.dialogueMode(), 1);
-    EXPECT_EQ(content.dialogueContentKind(), 5);
-    content.setSubElement("dialogue", "", {});
-    EXPECT_EQ(content.dialogueMode(), 0);
-    EXPECT_EQ(content.dialogueContentKind(), 0);
-    content.setSubElement("Dialogue", "1", {}); // names are exact
-    EXPECT_EQ(content.dialogueMode(), 0);
+    for (const auto& [unit, number] : {std::pair{"dB", 1}, {"", 0}, {"dB", 1}, {"db", 0}}) {
+        object.setSubElement("gain", "-6", {{"gainUnit", unit}});
+        EXPECT_EQ(object.gain(), -6);
+        EXPECT_EQ(object.gainUnit(), number);
+    }
 }
 
 TEST(ADMElements, ATrackFormatHasOneStreamFormat)
 {
-    ADMAudioTrackFormat track = trackFormat();
+    ADMAudioTrackFormat track({{"audioTrackFormatID", "AT_00010001_01"}, {"audioTrackFormatName", "T"}});
     track.setSubElement("audioStreamFormatIDRef", "AS_1", {});
     track.setSubElement("audioStreamFormatIDRef", "AS_1", {});
     try {
@@ -247,6 +136,36 @@ TEST(ADMElementTable, ManyIDsOfAnyLength)
     }
     EXPECT_EQ(table.find("x"), nullptr);
     EXPECT_EQ(table.find(std::string(100, 'x')), nullptr);
+}
+
+/// A different one for each number, all of the same hash: the standard library's function run backwards.
+std::string collidingID(std::uint64_t number)
+{
+    const auto text = [](std::uint64_t word) { return std::string(reinterpret_cast<const char*>(&word), sizeof word); };
+    constexpr std::uint64_t factor = 0xC6A4A7935BD1E995, inverse = 0x5F7A0EA7E59B19BD;
+    const auto mixed = [](std::uint64_t word) { return word ^ word >> 47; };
+    const std::uint64_t start = 0xC70F6907 ^ 16 * factor;
+    const std::uint64_t afterFirst = (start ^ mixed(number * factor) * factor) * factor;
+    return text(number) + text(mixed(afterFirst * inverse) * inverse);
+}
+
+TEST(ADMElementTable, IDsMadeToCollideCostNoMoreThanOthers)
+{
+    using Hash = std::hash<std::string>;
+    ASSERT_EQ(Hash()(collidingID(1)), Hash()(collidingID(2))) << "the standard library has another function";
+    constexpr std::uint64_t count = 50000; // a second for all of them, where each is compared with each
+    ADMElementTable<ADMAudioObject> table;
+    const std::clock_t start = std::clock();
+    for (const bool again : {false, true})
+        for (std::uint64_t i = 0; i < count; ++i)
+            table.insert(collidingID(i),
+                         std::make_unique<ADMAudioObject>(
+                             XMLAttributes({{"audioObjectID", again ? "second" : "first"}, {"audioObjectName", "O"}})));
+    EXPECT_LT(static_cast<double>(std::clock() - start) / CLOCKS_PER_SEC, 1.0);
+    EXPECT_EQ(table.size(), count);
+    for (std::uint64_t i = 0; i < count; ++i)
+        ASSERT_EQ(table.find(collidingID(i))->audioObjectID(), "second");
+    EXPECT_EQ(table.find(collidingID(count)), nullptr);
 }
 
 } // namespace

@@ -54,29 +54,6 @@ protected:
     TemporaryFolder folder_;
 };
 
-TEST_F(CAFUserData, EnumerationStopsWhenTold)
-{
-    perform("abc", [](platform::AudioFile& file) {
-        int seen = 0;
-        CAudioFileIO::ForAllUUIDChunksPerformBlock(
-            file, [&](const unsigned char*, void*, unsigned int, int, bool* stop) { *stop = ++seen == 2; });
-        EXPECT_EQ(seen, 2);
-    });
-    perform("", [](platform::AudioFile& file) { EXPECT_EQ(letters(file), ""); });
-}
-
-TEST_F(CAFUserData, FindTellsPresenceAndSize)
-{
-    perform(".ab", [](platform::AudioFile& file) {
-        unsigned int size = 1;
-        EXPECT_EQ(CAudioFileIO::FindCAFChunkInUUIDChunk(file, bytesOfUUID(uuid('b')), &size, nullptr), 0);
-        EXPECT_EQ(size, 17u);
-        EXPECT_EQ(CAudioFileIO::FindCAFChunkInUUIDChunk(file, bytesOfUUID(uuid('z')), &size, nullptr), -1);
-        EXPECT_EQ(size, 0u);
-        EXPECT_EQ(CAudioFileIO::FindCAFChunkInUUIDChunk(file, nullptr, nullptr, nullptr), -1);
-    });
-}
-
 TEST_F(CAFUserData, RemoveHitsTheRightItemsButTheSecondOfTwoNeighboursStays)
 {
     struct Case {
@@ -103,23 +80,12 @@ TEST_F(CAFUserData, AddReplacesAndAppends)
     EXPECT_EQ(file.Info().frames, 2); // four bytes of edit count, four of samples
 }
 
-TEST_F(CAFUserData, NothingHappensToWhatIsNoAudioFile)
-{
-    const auto never = [](platform::AudioFile&) { FAIL(); };
-    CAudioFileIO::PerformAudioFileOperations(CFileRef(), never);
-    CAudioFileIO::PerformAudioFileOperations(CFileRef((folder_ / "missing.caf").c_str(), false), never);
-    CAudioFileIO::PerformAudioFileOperations(CFileRef(folder_.write("text", "no audio here").c_str(), false), never);
-}
-
 TEST_F(CAFUserData, FLACIsRefused)
 {
     using platform::String;
-    EXPECT_TRUE(CAudioFileIO::IsSupportedFileType(String::fromUTF8("public.audio")));
     EXPECT_TRUE(CAudioFileIO::IsSupportedFileType(String::fromUTF8("audio/x-wav")));
     EXPECT_FALSE(CAudioFileIO::IsSupportedFileType(String::fromUTF8("audio/flac")));
     EXPECT_FALSE(CAudioFileIO::IsSupportedFileType(platform::ContentType::flac()));
-    EXPECT_FALSE(CAudioFileIO::IsSupportedFileType(String::fromUTF8("public.plain-text")));
-    EXPECT_FALSE(CAudioFileIO::IsSupportedFileType(String()));
 }
 
 } // namespace

@@ -20,20 +20,18 @@ std::string bodyOf(CAudioFileIO& file, const char (&id)[5])
 
 TEST(ChunkWalk, RecognisesContainersByTheirFirstSixteenBytes)
 {
-    struct Case {
+    const struct {
         std::string_view start;
         FourCC kind;
-    };
-    const Case cases[] = {
+    } cases[] = {
         {"RIFF____WAVE____", kWAVE}, {"RF64____WAVE____", kWAVE}, {"BW64____WAVE____", kWAVE},
         {"FORM____AIFF____", kAIFF}, {"FORM____AIFC____", kAIFF}, {"FORM____AIFx____", kAIFF},
         {"CAT ____REX2HEAD", kREX2}, {"CATx____REX2HEAD", kREX2}, {"CAT ____REX2HEAX", 0},
         {"RIFX____WAVE____", 0},     {"RIFF____AVI ____", 0},     {"FORM____8SVX____", 0},
         {"caff____________", 0},     {"RIFF____WAVE___", 0},      {"", 0},
     };
-    for (const Case& each : cases) {
-        CAudioFileIO file;
-        ASSERT_EQ(openInMemory(file, bytesOf(each.start), 0), kStatusOK);
+    for (const auto& each : cases) {
+        MemoryAudioFile file(bytesOf(each.start), 0);
         EXPECT_EQ(file.IsChunkBased(), each.kind) << each.start;
     }
     EXPECT_EQ(CAudioFileIO().IsChunkBased(), 0u);
@@ -46,8 +44,7 @@ TEST(ChunkWalk, ToleratesAMissingPadByte)
     const auto bare =
         ContainerBuilder("RIFF").format().unpadded("odd ", "abc").chunk("next", "1234").chunk("data", "xy");
     for (const ContainerBuilder& each : {padded, bare}) {
-        CAudioFileIO file;
-        openInMemory(file, each.bytes());
+        MemoryAudioFile file(each.bytes());
         EXPECT_EQ(listing(file), "fmt :16 odd :3 next:4 data:2");
         EXPECT_EQ(bodyOf(file, "next"), "1234");
     }
@@ -55,9 +52,7 @@ TEST(ChunkWalk, ToleratesAMissingPadByte)
 
 TEST(ChunkWalk, FindsTheLastOfSeveralAndInCAFTheFirstThatIsNotEmpty)
 {
-    CAudioFileIO file;
-    openInMemory(
-        file,
+    MemoryAudioFile file(
         ContainerBuilder("RIFF").format().chunk("LIST", "first").chunk("data", "xy").chunk("LIST", "last").bytes());
     EXPECT_EQ(bodyOf(file, "LIST"), "last");
     long size = 0;
@@ -149,8 +144,7 @@ TEST(ChunkWalk, ClaimsBeyondTheFileCostNothing)
     };
     for (const Case& each : cases) {
         SCOPED_TRACE(each.what);
-        CAudioFileIO file;
-        openInMemory(file, each.content);
+        MemoryAudioFile file(each.content);
         EXPECT_EQ(bodyOf(file, "data"), each.found);
         EXPECT_EQ(listing(file), each.listing);
     }
@@ -171,8 +165,7 @@ TEST(ChunkWalk, EveryPrefixOfAFileIsSafe)
     };
     for (const Bytes& image : images) {
         for (std::size_t length = 0; length <= image.size(); ++length) {
-            CAudioFileIO file;
-            openInMemory(file, BytesView(image).first(length));
+            MemoryAudioFile file(BytesView(image).first(length));
             std::int64_t reached = -8;
             ContainerExtent extent;
             const std::int32_t status = file.ForEachChunk(
@@ -194,9 +187,8 @@ TEST(ChunkWalk, EveryPrefixOfAFileIsSafe)
 
 TEST(ChunkWalk, StepByStep)
 {
-    CAudioFileIO file;
-    openInMemory(file,
-                 ContainerBuilder("FORM", "AIFF").chunk("ANNO", "abc").chunk("COMM", 2).chunk("NAME", "x", -8).bytes());
+    MemoryAudioFile file(
+        ContainerBuilder("FORM", "AIFF").chunk("ANNO", "abc").chunk("COMM", 2).chunk("NAME", "x", -8).bytes());
     ContainerChkExtended header;
     ASSERT_EQ(file.ReadExtendedFileHeader(header), 0);
     ChkHeader current, next;
@@ -273,8 +265,7 @@ TEST(ChunkWalk, ByteOrderTurnsAllButWAVE)
     for (const auto& [content, expected] :
          {std::pair{ContainerBuilder("RIFF").format().bytes(), 0x01020304u},
           std::pair{ContainerBuilder("FORM", "AIFF").format().bytes(), 0x04030201u}}) {
-        CAudioFileIO file;
-        openInMemory(file, content);
+        MemoryAudioFile file(content);
         unsigned int value = 0x01020304;
         int sign = 0x01020304;
         file.ByteOrder(&value);

@@ -1,6 +1,7 @@
 #include "AgentProcess.h"
 
 #include "platform/FileCoordination.h"
+#include "support/URLs.h"
 
 #include <gtest/gtest.h>
 
@@ -103,6 +104,15 @@ bool AgentProcess::expect(const std::string& line)
     return expectStart(line) == line;
 }
 
+void AgentProcess::begin(const std::string& name, const std::string& what, const std::string& path)
+{
+    tell(name + " " + what + " " + path);
+    if (what == "read" || what == "write")
+        return;
+    locks_.insert(name);
+    tell(name + " retain");
+}
+
 void AgentProcess::signal(int number) const
 {
     ::kill(id_, number);
@@ -131,7 +141,7 @@ bool AgentProcess::finish()
 bool awaitWaiting(const AgentProcess& agent, const std::string& path, bool isWriting)
 {
     using namespace platform;
-    const CoordinatedItem item(URL::createWithFileSystemPath(String::fromUTF8(path), PathStyle::posix, false));
+    const CoordinatedItem item(urlOf(path));
     const CoordinationParty wanted = {agent.id(), CoordinationParty::Role::waits, isWriting,
                                       coordinationItemNumber(item)};
     const Clock::time_point end = Clock::now() + kPatience;

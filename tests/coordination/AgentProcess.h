@@ -2,6 +2,7 @@
 #pragma once
 
 #include <deque>
+#include <set>
 #include <string>
 
 #include <sys/types.h>
@@ -24,6 +25,21 @@ public:
     bool hasSaid(const std::string& line);
     /// The next line that begins so, whole; empty as with expect.
     std::string expectStart(const std::string& start);
+
+    /// Begins an access ("read", "write"), or makes a lock ("presenterlock 0") and retains it.
+    void begin(const std::string& name, const std::string& what, const std::string& path);
+    /// Awaits that it is had.
+    bool gets(const std::string& name) { return expect(name + (locks_.contains(name) ? " held" : " in")); }
+    /// Whether it is had already.
+    bool has(const std::string& name) { return hasSaid(name + (locks_.contains(name) ? " held" : " in")); }
+    /// The lock is released; an access is left, as soon as it is had.
+    void end(const std::string& name) { tell(name + (locks_.contains(name) ? " release" : " leave")); }
+    bool beginsAndGets(const std::string& name, const std::string& what, const std::string& path)
+    {
+        begin(name, what, path);
+        return gets(name);
+    }
+
     void signal(int number) const;
     /// Waits for its end after SIGKILL.
     void kill();
@@ -39,6 +55,7 @@ private:
     int input_ = -1, output_ = -1;
     std::string partial_;
     std::deque<std::string> lines_;
+    std::set<std::string> locks_; // the names that are those of locks
 };
 
 /// Waits until the kernel shows that the process waits for the item, as coordinationParties tells; false after a

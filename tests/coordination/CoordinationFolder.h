@@ -3,6 +3,7 @@
 
 #include "platform/FileCoordination.h"
 #include "support/TemporaryFolder.h"
+#include "support/URLs.h"
 
 #include <gtest/gtest.h>
 
@@ -13,11 +14,6 @@ protected:
 
     std::string folder() const { return temporary_ / "coordination"; }
     std::string item(const std::string& name = "song.wav") const { return temporary_ / name; }
-    static platform::URLRef urlOf(const std::string& path)
-    {
-        return platform::URL::createWithFileSystemPath(platform::String::fromUTF8(path), platform::PathStyle::posix,
-                                                       false);
-    }
     platform::URLRef itemURL() const { return urlOf(item()); }
 
 private:

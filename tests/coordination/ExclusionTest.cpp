@@ -8,86 +8,42 @@ namespace {
 
 class ExclusionTest : public CoordinationFolder {};
 
-struct Case {
-    const char* holder; // what makes it, before the path
-    const char* comer;
-    bool waits;
+constexpr const char* kKinds[] = {"read",        "write",      "presenterlock 0", "presenterlock 1", "presenterlock 2",
+                                  "coordlock 0", "coordlock 1"};
+
+/// By the kinds, who waits for whom: a line for each holder, a column for each comer. Acquiring a presenter lock is a
+/// coordinated write.
+constexpr const char* kWaits[] = {
+    ". w w w w . w", // read
+    "w w w w w w w", // write
+    "w w w w w w w", // presenterlock 0
+    "w . . . . w .", // presenterlock 1: readers only
+    ". w w w w . w", // presenterlock 2: writers only
+    ". w w w w . w", // coordlock 0, reading
+    "w w w w w w w", // coordlock 1, writing
 };
 
-constexpr Case kCases[] = {
-    {"read", "read", false},
-    {"read", "write", true},
-    {"write", "read", true},
-    {"write", "write", true},
-    {"presenterlock 0", "read", true},
-    {"presenterlock 0", "write", true},
-    {"presenterlock 1", "read", true},
-    {"presenterlock 1", "write", false},
-    {"presenterlock 2", "read", false},
-    {"presenterlock 2", "write", true},
-    {"coordlock 0", "read", false},
-    {"coordlock 0", "write", true},
-    {"coordlock 1", "read", true},
-    {"coordlock 1", "write", true},
-    {"read", "presenterlock 0", true},
-    {"write", "presenterlock 0", true},
-    {"read", "presenterlock 1", true},
-    {"write", "presenterlock 1", true},
-    {"read", "presenterlock 2", true},
-    {"write", "presenterlock 2", true},
-    {"read", "coordlock 0", false},
-    {"write", "coordlock 0", true},
-    {"read", "coordlock 1", true},
-    {"presenterlock 1", "presenterlock 1", false},
-    {"presenterlock 0", "presenterlock 0", true},
-    {"presenterlock 2", "coordlock 1", true},
-};
-
-bool isAccess(const std::string& what)
-{
-    return what == "read" || what == "write";
-}
-
-/// Acquiring a presenter lock is a coordinated write.
 bool isWriting(const std::string& what)
 {
     return what != "read" && what != "coordlock 0";
-}
-
-void begin(AgentProcess& agent, const std::string& name, const std::string& what, const std::string& path)
-{
-    agent.tell(name + " " + what + " " + path);
-    if (!isAccess(what))
-        agent.tell(name + " retain");
-}
-
-std::string sign(const std::string& name, const std::string& what)
-{
-    return name + (isAccess(what) ? " in" : " held");
-}
-
-void end(AgentProcess& agent, const std::string& name, const std::string& what)
-{
-    agent.tell(name + (isAccess(what) ? " leave" : " release"));
-    agent.expect(name + (isAccess(what) ? " out" : " releases"));
 }
 
 } // namespace
 
 TEST_F(ExclusionTest, TheTableOfTypesHoldsBetweenProcesses)
 {
-    for (const Case& one : kCases) {
-        SCOPED_TRACE(std::string(one.holder) + ", then " + one.comer);
-        AgentProcess holder(folder()), comer(folder());
-        begin(holder, "a", one.holder, item());
-        ASSERT_TRUE(holder.expect(sign("a", one.holder)));
-        begin(comer, "b", one.comer, item());
-        if (one.waits) {
-            ASSERT_TRUE(awaitWaiting(comer, item(), isWriting(one.comer)));
-            EXPECT_FALSE(comer.hasSaid(sign("b", one.comer)));
-            end(holder, "a", one.holder);
+    for (std::size_t row = 0; row < std::size(kKinds); ++row)
+        for (std::size_t column = 0; column < std::size(kKinds); ++column) {
+            const std::string first = kKinds[row], second = kKinds[column];
+            SCOPED_TRACE(first + ", then " + second);
+            AgentProcess holder(folder()), comer(folder());
+            ASSERT_TRUE(holder.beginsAndGets("a", first, item()));
+            comer.begin("b", second, item());
+            if (kWaits[row][2 * column] == 'w') {
+                ASSERT_TRUE(awaitWaiting(comer, item(), isWriting(second)));
+                EXPECT_FALSE(comer.has("b"));
+                holder.end("a");
+            }
+            ASSERT_TRUE(comer.gets("b"));
         }
-        ASSERT_TRUE(comer.expect(sign("b", one.comer)));
-        end(comer, "b", one.comer);
-    }
 }

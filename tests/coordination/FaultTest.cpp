@@ -13,9 +13,10 @@
 
 #include <atomic>
 #include <cerrno>
-#include <condition_variable>
 #include <fstream>
+#include <functional>
 #include <future>
+#include <latch>
 #include <thread>
 
 #include <dlfcn.h>
@@ -73,23 +74,22 @@ TEST_F(FaultTest, APresenterMayNotAnswerAnswerTwiceDropTheAnswerLeaveOrSave)
         AgentProcess presenter(folder()), writer(folder()), next(folder()), reader(folder());
         presenter.tell(std::string("p present ") + one.behaviour + " " + item());
         ASSERT_TRUE(presenter.expect("p presents"));
-        writer.tell("w write " + item());
+        writer.begin("w", "write", item());
         ASSERT_TRUE(presenter.expect("p asked by writer"));
         if (one.release != nullptr) {
             ASSERT_TRUE(awaitWaiting(writer, item(), true));
-            next.tell("n write " + item()); // behind it in the queue, and not in the way of readers
+            next.begin("n", "write", item()); // behind it in the queue, and not in the way of readers
             ASSERT_TRUE(awaitWaiting(next, item(), true));
-            reader.tell("r read " + item());
-            ASSERT_TRUE(reader.expect("r in"));
-            reader.tell("r leave");
-            EXPECT_FALSE(writer.hasSaid("w in"));
+            ASSERT_TRUE(reader.beginsAndGets("r", "read", item()));
+            reader.end("r");
+            EXPECT_FALSE(writer.has("w"));
             presenter.tell(one.release);
         }
         if (*one.sign != '\0') {
             ASSERT_TRUE(presenter.expect(one.sign));
         }
-        ASSERT_TRUE(writer.expect("w in"));
-        writer.tell("w leave");
+        ASSERT_TRUE(writer.gets("w"));
+        writer.end("w");
         ASSERT_TRUE(writer.expect("w out"));
     }
 }
@@ -97,18 +97,16 @@ TEST_F(FaultTest, APresenterMayNotAnswerAnswerTwiceDropTheAnswerLeaveOrSave)
 TEST_F(FaultTest, ASecondRequestOfAKindWaitsForItsTurn)
 {
     AgentProcess presenter(folder()), first(folder()), second(folder());
-    presenter.tell("p presenterlock 1 " + item());
-    presenter.tell("p retain");
-    ASSERT_TRUE(presenter.expect("p held"));
+    ASSERT_TRUE(presenter.beginsAndGets("p", "presenterlock 1", item()));
     for (AgentProcess* reader : {&first, &second}) {
-        reader->tell("r read " + item());
+        reader->begin("r", "read", item());
         ASSERT_TRUE(awaitWaiting(*reader, item(), false));
     }
     for (std::string state; !state.ends_with(" R"); state = presenter.expectStart("p count"))
         presenter.tell("p state");
-    presenter.tell("p release");
+    presenter.end("p");
     for (AgentProcess* reader : {&first, &second})
-        ASSERT_TRUE(reader->expect("r in"));
+        ASSERT_TRUE(reader->gets("r"));
     presenter.tell("p state");
     EXPECT_TRUE(presenter.expect("p count 0"));
 }
@@ -116,32 +114,27 @@ TEST_F(FaultTest, ASecondRequestOfAKindWaitsForItsTurn)
 TEST_F(FaultTest, AStoppedProcessThatHoldsNothingStopsNobody)
 {
     AgentProcess stopped(folder()), writer(folder());
-    stopped.tell("p presenterlock 0 " + item());
-    stopped.tell("p retain");
-    ASSERT_TRUE(stopped.expect("p held"));
-    stopped.tell("p release");
+    ASSERT_TRUE(stopped.beginsAndGets("p", "presenterlock 0", item()));
+    stopped.end("p");
     ASSERT_TRUE(stopped.expect("p releases"));
     stopped.tell("p state");
     ASSERT_TRUE(stopped.expect("p count 0"));
     ASSERT_EQ(errorOfWrite(), 0); // the accessor in which the lock was acquired has ended too
     stopped.signal(SIGSTOP);
-    writer.tell("w write " + item());
-    EXPECT_TRUE(writer.expect("w in"));
+    EXPECT_TRUE(writer.beginsAndGets("w", "write", item()));
 }
 
 TEST_F(FaultTest, AForkedChildKeepsNothingOfItsParents)
 {
-    for (const char* held : {"a presenterlock 0 ", "a coordlock 1 "}) {
+    for (const char* held : {"presenterlock 0", "coordlock 1"}) {
         AgentProcess parent(folder()), writer(folder());
-        parent.tell(held + item());
-        parent.tell("a retain");
-        ASSERT_TRUE(parent.expect("a held"));
+        ASSERT_TRUE(parent.beginsAndGets("a", held, item()));
         parent.tell("fork");
         const pid_t child = std::stoi(parent.expectStart("forked ").substr(7));
-        writer.tell("w write " + item());
+        writer.begin("w", "write", item());
         ASSERT_TRUE(awaitWaiting(writer, item(), true));
         parent.kill();
-        EXPECT_TRUE(writer.expect("w in"));
+        EXPECT_TRUE(writer.gets("w"));
         EXPECT_EQ(::kill(child, SIGKILL), 0); // it was there all the time
     }
 }
@@ -153,17 +146,15 @@ TEST_F(FaultTest, InterruptingSignalsDoNotShow)
         agent->tell("storm");
     presenter.tell("p present never " + item());
     ASSERT_TRUE(presenter.expect("p presents"));
-    holder.tell("h coordlock 0 " + item());
-    holder.tell("h retain");
-    ASSERT_TRUE(holder.expect("h held"));
-    writer.tell("w write " + item());
+    ASSERT_TRUE(holder.beginsAndGets("h", "coordlock 0", item()));
+    writer.begin("w", "write", item());
     ASSERT_TRUE(presenter.expect("p asked by writer"));
     presenter.tell("p answer");
     ASSERT_TRUE(awaitWaiting(writer, item(), true)); // now for the reader
-    reader.tell("r read " + item());
-    holder.tell("h release");
-    writer.tell("w leave");
-    reader.tell("r leave"); // it may have passed the writer while that was asking
+    reader.begin("r", "read", item());
+    holder.end("h");
+    writer.end("w");
+    reader.end("r"); // it may have passed the writer while that was asking
     EXPECT_TRUE(writer.expect("w out"));
     EXPECT_TRUE(reader.expect("r out"));
 }
@@ -176,19 +167,18 @@ TEST_F(FaultTest, WithoutDescriptorsTheErrorSaysSo)
     AgentProcess poor(folder()), presenter(folder()), writer(folder());
     poor.tell("limit 3"); // input, output, errors
     ASSERT_TRUE(poor.expect("limited"));
-    poor.tell("w write " + item());
+    poor.begin("w", "write", item());
     EXPECT_EQ(poor.expectStart("w error").substr(0, 10), "w error " + std::to_string(EMFILE));
     poor.tell("p present atonce " + item());
     EXPECT_EQ(poor.expectStart("p error").substr(0, 10), "p error " + std::to_string(EMFILE));
-    poor.tell("l presenterlock 0 " + item());
-    poor.tell("l retain");
+    poor.begin("l", "presenterlock 0", item());
     for (std::string state; state != "l count 0";) {
         poor.tell("l state");
         state = poor.expectStart("l count");
         ASSERT_FALSE(state.empty());
     }
-    writer.tell("w write " + item()); // nothing was left behind
-    EXPECT_TRUE(writer.expect("w in"));
+    writer.begin("w", "write", item()); // nothing was left behind
+    EXPECT_TRUE(writer.gets("w"));
 }
 
 TEST_F(FaultTest, WithoutMemoryForLocksTheErrorSaysSoAndNothingIsHeld)
@@ -249,82 +239,69 @@ TEST_F(FaultTest, AFolderThatIsNotOursAloneIsRefused)
 TEST_F(FaultTest, ADeletedFolderIsMadeAgainAndWaitersFindEachOtherThere)
 {
     AgentProcess holder(folder()), waiter(folder()), presenter(folder());
-    presenter.tell("p presenterlock 0 " + item("presented"));
-    presenter.tell("p retain");
-    ASSERT_TRUE(presenter.expect("p held"));
-    holder.tell("h write " + item());
-    ASSERT_TRUE(holder.expect("h in"));
-    waiter.tell("w write " + item());
+    ASSERT_TRUE(presenter.beginsAndGets("p", "presenterlock 0", item("presented")));
+    ASSERT_TRUE(holder.beginsAndGets("h", "write", item()));
+    waiter.begin("w", "write", item());
     ASSERT_TRUE(awaitWaiting(waiter, item(), true));
     fs::remove_all(folder());
     ASSERT_EQ(errorOfWrite(item("other")), 0); // makes it again
     ASSERT_TRUE(fs::exists(folder()));
-    holder.tell("h leave");
-    ASSERT_TRUE(waiter.expect("w in")); // in the new folder, where another finds it
+    holder.end("h");
+    ASSERT_TRUE(waiter.gets("w")); // in the new folder, where another finds it
     AgentProcess late(folder());
-    late.tell("l write " + item());
+    late.begin("l", "write", item());
     ASSERT_TRUE(awaitWaiting(late, item(), true));
-    waiter.tell("w leave");
-    ASSERT_TRUE(late.expect("l in"));
+    waiter.end("w");
+    ASSERT_TRUE(late.gets("l"));
     // A presenter that notices takes what it holds along.
-    presenter.tell("q presenterlock 0 " + item("more"));
-    presenter.tell("q retain");
-    ASSERT_TRUE(presenter.expect("q held"));
-    late.tell("m write " + item("presented"));
+    ASSERT_TRUE(presenter.beginsAndGets("q", "presenterlock 0", item("more")));
+    late.begin("m", "write", item("presented"));
     ASSERT_TRUE(awaitWaiting(late, item("presented"), true));
-    presenter.tell("p release");
-    EXPECT_TRUE(late.expect("m in"));
+    presenter.end("p");
+    EXPECT_TRUE(late.gets("m"));
 }
 
 TEST_F(FaultTest, WithoutTicketsAccessStillExcludesAndEnds)
 {
     const ItemWindow window(CoordinatedItem(itemURL()).key());
     AgentProcess holder(folder()), writer(folder()), reader(folder());
-    holder.tell("h write " + item());
-    ASSERT_TRUE(holder.expect("h in"));
+    ASSERT_TRUE(holder.beginsAndGets("h", "write", item()));
     Descriptor last = CoordinationDirectory::current()->takeStripe(window.stripe);
     ASSERT_TRUE(tryLock(last.get(), window.range(kWriterTickets + kTicketCount - 1), LockKind::exclusive));
-    writer.tell("w write " + item());
-    reader.tell("r read " + item());
+    writer.begin("w", "write", item());
+    reader.begin("r", "read", item());
     ASSERT_TRUE(awaitWaiting(reader, item(), false));
     ASSERT_TRUE(awaitWaiting(writer, item(), false));
-    holder.tell("h leave");
+    holder.end("h");
     ASSERT_TRUE(holder.expect("h out"));
-    EXPECT_FALSE(writer.hasSaid("w in") || reader.hasSaid("r in")); // the ticket is ahead of both
+    EXPECT_FALSE(writer.has("w") || reader.has("r")); // the ticket is ahead of both
     unlock(last.get(), window.whole());
-    writer.tell("w leave");
-    reader.tell("r leave");
+    writer.end("w");
+    reader.end("r");
     EXPECT_TRUE(writer.expect("w out"));
     EXPECT_TRUE(reader.expect("r out"));
 }
 
 TEST_F(FaultTest, AFileMayBeCreatedReplacedAndRenamedWhileItIsLocked)
 {
-    for (const char* step : {"created", "replaced", "renamed", "linked"}) {
-        SCOPED_TRACE(step);
-        const std::string path = item(std::string(step) + ".wav");
+    const auto write = [](const std::string& path) { std::ofstream(path) << "content"; };
+    const std::string path = item();
+    const std::pair<const char*, std::function<void()>> steps[] = {
+        {"created", [&] { write(path); }},
+        {"replaced", [&] { write(item("fresh")), fs::rename(item("fresh"), path); }},
+        {"renamed", [&] { fs::rename(path, item("away.wav")); }}, // the lock is the name's
+        {"linked", [&] { fs::create_directory_symlink(fs::path(path).parent_path(), item("folder")); }},
+    };
+    for (const auto& [name, step] : steps) {
+        SCOPED_TRACE(name);
         AgentProcess holder(folder()), writer(folder());
-        if (std::string(step) != "created")
-            std::ofstream(path) << "old";
-        holder.tell("h presenterlock 0 " + path);
-        holder.tell("h retain");
-        ASSERT_TRUE(holder.expect("h held"));
-        std::string asked = path;
-        if (std::string(step) == "created") {
-            std::ofstream(path) << "new";
-        } else if (std::string(step) == "replaced") {
-            std::ofstream(item("fresh")) << "new";
-            fs::rename(item("fresh"), path);
-        } else if (std::string(step) == "renamed") {
-            fs::rename(path, item("away.wav")); // the lock is the name's
-        } else {
-            fs::create_directory_symlink(fs::path(path).parent_path(), item("folder"));
-            asked = item("folder/linked.wav");
-        }
-        writer.tell("w write " + asked);
+        ASSERT_TRUE(holder.beginsAndGets("h", "presenterlock 0", path));
+        step();
+        const std::string asked = fs::exists(item("folder")) ? item("folder/song.wav") : path;
+        writer.begin("w", "write", asked);
         ASSERT_TRUE(awaitWaiting(writer, asked, true));
-        holder.tell("h release");
-        EXPECT_TRUE(writer.expect("w in"));
+        holder.end("h");
+        EXPECT_TRUE(writer.gets("w"));
     }
 }
 
@@ -334,29 +311,19 @@ TEST_F(FaultTest, DescriptorsThreadsAndTheFolderReturnToTheirLevel)
     std::thread([] {}).join(); // a sanitizer begins a thread of its own with the first
     const auto before = std::pair(openDescriptors(), threads());
     std::vector<std::shared_ptr<KTFilePresenterLock>> held;
-    std::mutex mutex;
-    std::condition_variable changed;
-    std::size_t called = 0, entered = 0;
+    std::latch called(kMany);
+    std::atomic<std::size_t> entered = 0;
     for (std::size_t i = 0; i < kMany; ++i) {
         held.push_back(KTFilePresenterLock::initLockWithType(KTFilePresenterLock::LockType::readersAndWriters,
                                                              urlOf(item("song-" + std::to_string(i)))));
-        held.back()->retainLockWithFinishedHandler([&] {
-            const std::lock_guard guard(mutex);
-            ++called;
-            changed.notify_all();
-        });
+        held.back()->retainLockWithFinishedHandler([&] { called.count_down(); });
     }
-    {
-        std::unique_lock guard(mutex);
-        changed.wait(guard, [&] { return called == kMany; });
-    }
+    called.wait();
     std::vector<std::thread> waiting;
     for (const auto& lock : held)
         waiting.emplace_back([&, url = lock->url()] {
-            FileCoordinator().coordinateWriting(url, FileCoordinator::WritingOptions::none, [&](const URLRef&) {
-                const std::lock_guard guard(mutex);
-                ++entered;
-            });
+            FileCoordinator().openForWriting(url, FileCoordinator::WritingOptions::none);
+            ++entered;
         });
     for (const auto& lock : held)
         while (!lock->isWriterWaiting())

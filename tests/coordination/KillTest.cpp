@@ -34,21 +34,20 @@ void expectNoViolation(const AgentProcess& agent)
 
 struct Victim {
     const char* name;
-    const char* held;   // what a first process holds, before the path
-    const char* isHeld; // its sign
-    const char* asks;   // what a second one asks for, and waits
-    bool killsHolder;   // else the one that asks
-    const char* third;  // what a third asks for behind it
+    const char* held;  // by a first process
+    const char* asks;  // what a second one asks for, and waits
+    bool killsHolder;  // else the one that asks
+    const char* third; // what a third asks for behind it
 };
 
 constexpr Victim kVictims[] = {
-    {"holder of an access", "a write", "a in", "b write", true, "c read"},
-    {"presenter that is held", "a presenterlock 0", "a held", "b write", true, "c read"},
-    {"presenter that never answers", "a present never", "a presents", "b write", true, "c write"},
-    {"waiter", "a write", "a in", "b write", false, "c write"},
-    {"waiting reader", "a write", "a in", "b read", false, "c write"},
-    {"asker that has the queue", "a presenterlock 0", "a held", "b write", false, "c write"},
-    {"asker that is parked", "a presenterlock 1", "a held", "b read", false, "c read"},
+    {"holder of an access", "write", "write", true, "read"},
+    {"presenter that is held", "presenterlock 0", "write", true, "read"},
+    {"presenter that never answers", "present never", "write", true, "write"},
+    {"waiter", "write", "write", false, "write"},
+    {"waiting reader", "write", "read", false, "write"},
+    {"asker that has the queue", "presenterlock 0", "write", false, "write"},
+    {"asker that is parked", "presenterlock 1", "read", false, "read"},
 };
 
 TEST_F(KillTest, WhoeverIsKilledLeavesNobodyStuck)
@@ -57,26 +56,26 @@ TEST_F(KillTest, WhoeverIsKilledLeavesNobodyStuck)
         for (const Victim& victim : kVictims) {
             SCOPED_TRACE(victim.name);
             AgentProcess first(folder()), second(folder()), third(folder());
-            first.tell(std::string(victim.held) + " " + item());
-            if (std::string(victim.isHeld) == "a held")
-                first.tell("a retain");
-            ASSERT_TRUE(first.expect(victim.isHeld));
-            const auto waitFor = [&](AgentProcess& agent, const std::string& what) {
-                agent.tell(what + " " + item());
-                return awaitWaiting(agent, item(), what.ends_with("write"));
-            };
-            ASSERT_TRUE(waitFor(second, victim.asks));
-            ASSERT_TRUE(waitFor(third, victim.third));
+            if (std::string_view(victim.held) == "present never") {
+                first.tell("a present never " + item());
+                ASSERT_TRUE(first.expect("a presents"));
+            } else {
+                ASSERT_TRUE(first.beginsAndGets("a", victim.held, item()));
+            }
+            second.begin("b", victim.asks, item());
+            ASSERT_TRUE(awaitWaiting(second, item(), victim.asks == std::string_view("write")));
+            third.begin("c", victim.third, item());
+            ASSERT_TRUE(awaitWaiting(third, item(), victim.third == std::string_view("write")));
             if (victim.killsHolder) {
                 first.kill();
-                second.tell("b leave");
-                third.tell("c leave"); // either may be the first
+                second.end("b");
+                third.end("c"); // either may be the first
                 ASSERT_TRUE(second.expect("b out"));
             } else {
                 second.kill();
-                first.tell(std::string(victim.isHeld) == "a in" ? "a leave" : "a release");
+                first.end("a");
             }
-            ASSERT_TRUE(third.expect("c in"));
+            ASSERT_TRUE(third.gets("c"));
         }
 }
 

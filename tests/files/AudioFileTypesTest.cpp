@@ -4,45 +4,27 @@
 
 TEST(AudioFileTypes, TheTableIsInItsOrder)
 {
-    struct Row {
-        const char *type, *extension, *left, *right, *displayName;
-    };
-    const Row rows[] = {
-        {"AIFF", ".aif", ".L.aif", ".R.aif", "AIFF File"},
-        {"AIFF", ".aif", ".ail", ".air", "AIFF File"},
-        {"AIFF", ".aiff", "", "", "AIFF File"},
-        {"WAVE", ".wav", ".L.wav", ".R.wav", "Wave File PC"},
-        {"WAVE", ".wav", ".wal", ".war", "Wave File PC"},
-        {".WAV", ".wav", ".L.wav", ".R.wav", "Wave File PC"},
-        {".WAV", ".wav", ".wal", ".war", "Wave File PC"},
-        {"caff", ".caf", ".L.caf", ".R.caf", "CAF File"},
-        {"MPG3", ".mp3", ".L.mp3", ".R.mp3", "MP3 File"},
-        {"mpg4", ".mp4", "", "", "MP4 File"},
-        {"M4A ", ".m4a", ".L.m4a", ".R.m4a", "AAC File"},
-    };
-    const int suffixLengths[] = {6, 4, 5, 6, 4, 6, 4, 6, 6, 4, 6};
+    const char* const rows[] = {"AIFF 6 .aif .L.aif .R.aif AIFF File",
+                                "AIFF 4 .aif .ail .air AIFF File",
+                                "AIFF 5 .aiff   AIFF File",
+                                "WAVE 6 .wav .L.wav .R.wav Wave File PC",
+                                "WAVE 4 .wav .wal .war Wave File PC",
+                                ".WAV 6 .wav .L.wav .R.wav Wave File PC",
+                                ".WAV 4 .wav .wal .war Wave File PC",
+                                "caff 6 .caf .L.caf .R.caf CAF File",
+                                "MPG3 6 .mp3 .L.mp3 .R.mp3 MP3 File",
+                                "mpg4 4 .mp4   MP4 File",
+                                "M4A  6 .m4a .L.m4a .R.m4a AAC File"};
     ASSERT_EQ(std::size(rows), kAudioFileTypeRows);
     for (int i = 0; i < kAudioFileTypeRows; ++i) {
-        SCOPED_TRACE(i);
         const AudioFileTypeRow& row = *CFileUtilAudioFileType(i);
-        const Row& expected = rows[i];
-        EXPECT_EQ(fourCCText(row.type), expected.type);
-        EXPECT_STREQ(row.extension, expected.extension);
-        EXPECT_STREQ(row.leftSuffix, expected.left);
-        EXPECT_STREQ(row.rightSuffix, expected.right);
-        EXPECT_STREQ(row.displayName, expected.displayName);
-        EXPECT_EQ(row.suffixLength, suffixLengths[i]);
+        std::string found = fourCCText(row.type) + ' ' + std::to_string(row.suffixLength);
+        for (const char* text : {row.extension, row.leftSuffix, row.rightSuffix, row.displayName})
+            (found += ' ') += text;
+        EXPECT_EQ(found, rows[i]);
     }
     EXPECT_EQ(CFileUtilAudioFileType(-1), nullptr);
     EXPECT_EQ(CFileUtilAudioFileType(kAudioFileTypeRows)->type, 0U);
-}
-
-TEST(AudioFileTypes, AreFoundByTheirFirstRow)
-{
-    EXPECT_EQ(CFileUtilGetPointAudioFileType(fourCC("AIFF")), CFileUtilAudioFileType(0));
-    EXPECT_EQ(CFileUtilGetPointAudioFileType(fourCC(".WAV")), CFileUtilAudioFileType(5));
-    EXPECT_STREQ(CFileUtilGetPointAudioFileType(fourCC("none"))->displayName, "Original Type");
-    EXPECT_EQ(CFileUtilGetPointAudioFileType(0), CFileUtilAudioFileType(kAudioFileTypeRows));
 }
 
 TEST(AudioFileTypes, OfExtensions)
@@ -69,18 +51,10 @@ TEST(AudioFileTypes, OfExtensions)
     const Case cases[] = {
         {"/x.MID", fourCC("Midi"), false, false},
         {"/x.Mp4", fourCC("mpg4"), true, true},
-        {"/x.mov", fourCC("MooV"), true, true},
-        {"/x.mxf", fourCC("MXF "), false, true},
-        {"/x.ac3", fourCC("ac-3"), true, false},
-        {"/x.m4a", fourCC("M4A "), true, false},
-        {"/x.aac", fourCC("adts"), true, false},
-        {"/x.mp3", fourCC("MPG3"), true, false},
         {"/x.wav", fourCC("WAVE"), false, false},
         {"/x.mpegs", 0, false, false},
         {"/\xFF.wav", 0, false, false},
         {"/.wav", 0, false, false},
-        {"/wav", 0, false, false},
-        {"/x.", 0, false, false},
         {"", 0, false, false},
     };
     for (const Case& each : cases) {

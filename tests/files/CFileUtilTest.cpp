@@ -4,6 +4,7 @@
 #include "platform/core/Status.h"
 
 #include "support/FaultInjection.h"
+#include "support/References.h"
 #include "support/TemporaryFolder.h"
 
 #include <gtest/gtest.h>
@@ -15,11 +16,6 @@ namespace fs = std::filesystem;
 using platform::String;
 
 namespace {
-
-CFileRef file(const std::string& path)
-{
-    return CFileRef(path.c_str(), false);
-}
 
 String text(const std::string& utf8)
 {
@@ -43,10 +39,6 @@ TEST(CFileUtil, DeletesFilesAndLinksOnly)
     EXPECT_TRUE(fs::exists(folder / "folder"));
     EXPECT_EQ(CFileUtilDelete(file(folder / "missing")), kStatusFileNotFound);
     EXPECT_EQ(CFileUtilDelete(CFileRef::None), kStatusParameterError);
-
-    EXPECT_EQ(CFileUtilFileSize(file(folder / "folder")), kStatusParameterError);
-    EXPECT_EQ(CFileUtilFileSize(file(folder / "missing")), kStatusFileNotFound);
-    EXPECT_EQ(CFileUtilFileSize(CFileRef::None), kStatusParameterError);
 }
 
 TEST(UniqueName, IsTheFirstAtWhichNothingIs)
@@ -56,6 +48,8 @@ TEST(UniqueName, IsTheFirstAtWhichNothingIs)
         return fs::path(CFileUtilCreateUniqueFileName(text(folder / name), text(separator)).utf8()).filename().string();
     };
     EXPECT_EQ(unique("Take.aif"), "Take.aif");
+    const String free = text(folder / "/Take.aif");
+    EXPECT_EQ(CFileUtilCreateUniqueFileName(free, text(" ")), free); // the very path
     folder.write("Take.aif", "");
     EXPECT_EQ(unique("Take.aif"), "Take 1.aif");
     folder.write("Take 1.aif", "");

@@ -23,17 +23,8 @@ TEST(PMName, ElementsBetweenSeparators)
     const struct {
         const char* name;
         std::vector<std::string> elements;
-    } cases[] = {{nullptr, {}},
-                 {"", {}},
-                 {"/", {}},
-                 {"a", {"a"}},
-                 {"/a", {"a"}},
-                 {"a/b", {"a", "b"}},
-                 {"/a/b/", {"a", "b"}},
-                 {"a//b", {"a", "", "b"}},
-                 {"//a", {"", "a"}},
-                 {"a//", {"a", ""}},
-                 {"//", {""}}};
+    } cases[] = {{nullptr, {}},      {"", {}},           {"/a/b/", {"a", "b"}}, {"a//b", {"a", "", "b"}},
+                 {"//a", {"", "a"}}, {"a//", {"a", ""}}, {"//", {""}}};
     for (const auto& c : cases) {
         std::list<PMName> out;
         out.emplace_back("first");
@@ -44,19 +35,6 @@ TEST(PMName, ElementsBetweenSeparators)
                                [](const std::string& a, const PMName& b) { return a == b.Get(); }))
             << c.name;
     }
-}
-
-TEST(PMName, CatAndCopies)
-{
-    PMName name;
-    name.Cat(nullptr);
-    name.Cat("");
-    EXPECT_EQ(name.Get(), nullptr);
-    name.Cat("loop");
-    const PMName copy = name;
-    name.Cat(name); // its own text
-    EXPECT_STREQ(name, "looploop");
-    EXPECT_STREQ(copy, "loop");
 }
 
 TEST(PMName, StoredForm)

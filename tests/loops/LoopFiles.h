@@ -17,13 +17,11 @@ inline VireoLoopChunksManager manage(const std::string& path, bool forWriting = 
                                   forWriting ? AudioFile::Permission::readWrite : AudioFile::Permission::read);
 }
 
-/// An audio file without tags: `ahead` between the format and the samples, `behind` after them.
-inline Bytes audioFile(FourCC container, const Chunks& ahead = {}, const Chunks& behind = {})
+/// An audio file without tags, with these chunks behind or ahead of its samples.
+inline Bytes audioFile(FourCC container, const Chunks& others = {}, bool isAhead = false)
 {
-    Chunks chunks{formatChunk(container)};
-    chunks.insert(chunks.end(), ahead.begin(), ahead.end());
-    chunks.push_back(dataChunk(container));
-    chunks.insert(chunks.end(), behind.begin(), behind.end());
+    Chunks chunks{formatChunk(container), dataChunk(container)};
+    chunks.insert(isAhead ? chunks.end() - 1 : chunks.end(), others.begin(), others.end());
     return buildContainer(container, chunks);
 }
 

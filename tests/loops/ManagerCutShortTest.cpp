@@ -2,8 +2,6 @@
 #include "LoopFiles.h"
 #include "support/FaultyDisk.h"
 
-#include <functional>
-
 namespace {
 
 struct Layout {
@@ -48,8 +46,7 @@ protected:
                 chunks.insert(chunks.end(), tagged.begin() + 2, tagged.end());
         }
         chunks.insert(chunks.begin() + 1, other.front());
-        original =
-            GetParam().isAhead ? audioFile(GetParam().container, chunks) : audioFile(GetParam().container, {}, chunks);
+        original = audioFile(GetParam().container, chunks, GetParam().isAhead);
     }
 
     /// Whether it was done, and the number of calls that changed the file.

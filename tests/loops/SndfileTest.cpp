@@ -1,16 +1,8 @@
 // What libsndfile reads of the tags that are written into AIFF files.
 #include "LoopFiles.h"
-
-#include <sndfile.h>
-
-#include <memory>
+#include "audiofile/SoundFile.h"
 
 namespace {
-
-struct Closer {
-    void operator()(SNDFILE* file) const { sf_close(file); }
-};
-using SoundFile = std::unique_ptr<SNDFILE, Closer>;
 
 SoundFile openSound(const std::string& path)
 {
@@ -35,8 +27,7 @@ TEST(Sndfile, ReadsLoopInformationAndTexts)
     const TemporaryFolder folder;
     for (const bool isAhead : {false, true}) {
         const Chunks other{{fourCC("APPL"), "other"}};
-        const std::string path =
-            folder.write("loop.aiff", isAhead ? audioFile(kAIFF, other) : audioFile(kAIFF, {}, other));
+        const std::string path = folder.write("loop.aiff", audioFile(kAIFF, other, isAhead));
         for (const std::size_t length : {9u, 30u, 4u}) { // a new file, and edits of one that has tags
             ASSERT_TRUE(manage(path).writeChunks(everyKind(length)));
             const Tags tags = tagsOf(path);

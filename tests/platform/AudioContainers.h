@@ -5,6 +5,7 @@
 #include "platform/core/ByteReader.h"
 #include "platform/core/ByteWriter.h"
 #include "support/TemporaryFolder.h"
+#include "support/URLs.h"
 
 #include <gtest/gtest.h>
 
@@ -130,8 +131,7 @@ inline std::unique_ptr<platform::AudioFile> openAudio(const std::string& path, b
                                                       std::int32_t* status = nullptr)
 {
     using namespace platform;
-    const URLRef url = URL::createWithFileSystemPath(String::fromUTF8(path), PathStyle::posix, false);
-    return AudioFile::open(*url, forWriting ? AudioFile::Permission::readWrite : AudioFile::Permission::read, 0,
+    return AudioFile::open(*urlOf(path), forWriting ? AudioFile::Permission::readWrite : AudioFile::Permission::read, 0,
                            status);
 }
 

@@ -5,6 +5,7 @@
 #include "platform/SystemCalls.h"
 #include "platform/core/Status.h"
 #include "support/FaultInjection.h"
+#include "support/URLs.h"
 
 #include <filesystem>
 
@@ -12,11 +13,6 @@ using namespace platform;
 using namespace std::string_literals;
 
 namespace {
-
-URLRef urlOf(const std::string& path)
-{
-    return URL::createWithFileSystemPath(String::fromUTF8(path), PathStyle::posix, false);
-}
 
 std::uint64_t packetsOf(AudioFile& file)
 {
@@ -90,68 +86,6 @@ TEST(AudioFileService, CreatesWritesAndReadsLinearPCM)
         EXPECT_EQ(read.substr(0, 4 * format.bytesPerFrame), samples.substr(format.bytesPerFrame));
         EXPECT_EQ(itemsOf(*file, fourCC("note")), std::vector<std::string>{"item"});
         walkContainer(readFile(path));
-    }
-}
-
-TEST(AudioFileService, DescribesWhatContainersSay)
-{
-    constexpr FourCC wave = fourCC("WAVE"), aiff = fourCC("AIFF"), aifc = fourCC("AIFC"), caff = fourCC("caff");
-    constexpr FourCC fmt = fourCC("fmt "), comm = fourCC("COMM");
-    const auto caf = [](const char* id, std::uint32_t packetSize, std::uint32_t frames) {
-        ByteWriter writer;
-        writer.write(8000.0);
-        writer.write(bytesOf(id));
-        for (std::uint32_t field : {0u, packetSize, frames, 1u, 0u})
-            writer.write(field);
-        return std::string(textOf(writer.view()));
-    };
-    const std::string rate = "\x40\x0B\xFA\0\0\0\0\0\0\0"s, data(68, 'd'); // 8000 Hz
-    const auto ssnd = std::string(8, '\0') + data;
-    const struct {
-        const char* name;
-        FourCC container;
-        Chunks chunks;
-        FourCC formatId; // 0: refused
-        std::uint32_t flags, packetSize, frames;
-        std::uint64_t packets;
-    } cases[] = {
-        // clang-format off
-        {"mu-law", wave, {{fmt, "\7\0\1\0\x40\x1F\0\0\x40\x1F\0\0\1\0\x10\0"s}, {fourCC("data"), data}},
-         fourCC("ulaw"), 0, 1, 1, 68},
-        {"extensible float", wave,
-         {{fmt, "\xFE\xFF\2\0\x40\x1F\0\0\0\0\0\0\x10\0\x40\0\x16\0\x40\0\0\0\0\0\3\0\0\0\0\0\x10\0"s + "12345678"},
-          {fourCC("data"), data}}, fourCC("lpcm"), 9, 16, 1, 4},
-        {"ADPCM", wave, {{fmt, "\x11\0\1\0\x40\x1F\0\0\0\0\0\0\x22\0\4\0\2\0\x3D\0"s}, {fourCC("data"), data}},
-         fourCC('m', 's', 0, 0x11), 0, 34, 61, 2},
-        {"no block", wave, {{fmt, "\1\0\1\0\x40\x1F\0\0\0\0\0\0\0\0\x10\0"s}, {fourCC("data"), data}}, 0, 0, 0, 0, 0},
-        {"short format", wave, {{fmt, "\1\0\1\0"s}, {fourCC("data"), data}}, 0, 0, 0, 0, 0},
-        {"no data", caff, {{fourCC("desc"), caf("lpcm", 2, 1)}}, 0, 0, 0, 0, 0},
-        {"fewer frames than samples", aiff, {{comm, "\0\1\0\0\0\5\0\x0C"s + rate}, {fourCC("SSND"), ssnd}},
-         fourCC("lpcm"), 6, 2, 1, 5},
-        {"little-endian", aifc, {{comm, "\0\2\0\0\0\x63\0\x10"s + rate + "sowt"}, {fourCC("SSND"), ssnd}},
-         fourCC("lpcm"), 12, 4, 1, 17},
-        {"IMA", aifc, {{comm, "\0\1\0\0\0\2\0\x10"s + rate + "ima4"}, {fourCC("SSND"), ssnd}},
-         fourCC("ima4"), 0, 34, 64, 2},
-        {"packet table", caff,
-         {{fourCC("desc"), caf("aac ", 0, 1024)}, {fourCC("pakt"), "\0\0\0\0\0\0\0\7"s + std::string(16, '\0')},
-          {fourCC("data"), data}}, fourCC("aac "), 0, 0, 1024, 7},
-        // clang-format on
-    };
-    TemporaryFolder folder;
-    for (const auto& test : cases) {
-        SCOPED_TRACE(test.name);
-        const auto file = openAudio(folder.write("file", buildContainer(test.container, test.chunks)));
-        ASSERT_NE(file, nullptr);
-        StreamDescription format;
-        ASSERT_EQ(file->dataFormat(format), test.formatId != 0 ? 0 : kStatusIOError);
-        if (test.formatId == 0)
-            continue;
-        EXPECT_EQ(format.sampleRate, 8000);
-        EXPECT_EQ(fourCCText(format.formatId), fourCCText(test.formatId));
-        EXPECT_EQ(format.formatFlags, test.flags);
-        EXPECT_EQ(format.bytesPerPacket, test.packetSize);
-        EXPECT_EQ(format.framesPerPacket, test.frames);
-        EXPECT_EQ(packetsOf(*file), test.packets);
     }
 }
 
@@ -234,38 +168,6 @@ TEST(AudioFileService, UserDataAreAddressedByTypeAndIndex)
     // Another handle's edit is seen.
     ASSERT_EQ(openAudio(path)->removeUserData(fourCC("midi"), 0), 0);
     EXPECT_EQ(itemsOf(*file, fourCC("midi")), std::vector<std::string>{""});
-}
-
-TEST(AudioFileService, InformationIsReadAndReplaced)
-{
-    TemporaryFolder folder;
-    const auto withInfo = [](const std::string& body) {
-        return buildContainer(fourCC("caff"),
-                              {formatChunk(fourCC("caff")), {fourCC("info"), body}, dataChunk(fourCC("caff"))});
-    };
-    Dictionary texts;
-    // Two pairs; a count of 4 billion with one pair; a value without its end; nothing.
-    for (const std::string& body : {"\0\0\0\2artist\0A\0title\0T\0"s,
-                                    "\xFF\xFF\xFF\xFF"
-                                    "artist\0A\0"s,
-                                    "\0\0\0\1artist\0A"s, ""s}) {
-        const auto file = openAudio(folder.write("file", withInfo(body)));
-        ASSERT_EQ(file->information(texts), 0);
-        EXPECT_EQ(texts.size(), body.find("title") != body.npos ? 2u : body.size() == 13 ? 1u : 0u) << body.size();
-    }
-    const auto file = openAudio(folder.write("file", withInfo("\0\0\0\1artist\0A\0"s)));
-    const Dictionary wanted{{"comments", "ümläut"}, {"title", ""}};
-    ASSERT_EQ(file->setInformation(wanted), 0);
-    EXPECT_EQ(file->information(texts), 0);
-    EXPECT_EQ(texts, wanted);
-    EXPECT_EQ(itemsOf(*file, fourCC("info")).at(0), "\0\0\0\2comments\0ümläut\0title\0\0"s);
-    EXPECT_EQ(file->setInformation({{"title", 3}}), kStatusParameterError);
-    EXPECT_EQ(file->setInformation({{"title", "a\0b"s}}), kStatusParameterError);
-    ASSERT_EQ(file->setInformation({}), 0);
-    EXPECT_EQ(itemsOf(*file, fourCC("info")).size(), 0u);
-    EXPECT_EQ(file->setInformation({}), 0);
-    const auto wave = openAudio(folder.write("wave", buildContainer(fourCC("WAVE"), {formatChunk(fourCC("WAVE"))})));
-    EXPECT_EQ(wave->information(texts), kStatusParameterError);
 }
 
 TEST(AudioFileService, HostileFilesCostNothing)

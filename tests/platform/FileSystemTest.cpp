@@ -1,5 +1,6 @@
 #include "platform/FileSystem.h"
 #include "support/TemporaryFolder.h"
+#include "support/URLs.h"
 
 #include <gtest/gtest.h>
 
@@ -7,20 +8,6 @@
 
 namespace fs = std::filesystem;
 using namespace platform;
-
-namespace {
-
-URLRef urlOf(const std::string& path, bool isDirectory = false)
-{
-    return URL::createWithFileSystemPath(String::fromUTF8(path), PathStyle::posix, isDirectory);
-}
-
-std::string pathOf(const URLRef& url)
-{
-    return url ? url->copyFileSystemPath(PathStyle::posix).utf8() : "(none)";
-}
-
-} // namespace
 
 TEST(FileHandle, FindsTheItemAfterARenameInItsFolder)
 {
@@ -40,31 +27,6 @@ TEST(FileHandle, FindsTheItemAfterARenameInItsFolder)
     fs::remove(folder / "renamed.wav");
     EXPECT_EQ(urlFromFileHandle(handle), nullptr);
     EXPECT_TRUE(catalogName(handle).isNull());
-}
-
-TEST(FileHandle, IsZeroWhenThereIsNoItem)
-{
-    FileHandle handle;
-    ASSERT_TRUE(makeFileHandle("/", handle));
-    EXPECT_EQ(catalogName(handle).utf8(), "/");
-    EXPECT_TRUE(urlFromFileHandle(handle)->hasDirectoryPath());
-    for (const char* path : {"/no/such/item", "relative", "", static_cast<const char*>(nullptr)}) {
-        ASSERT_TRUE(makeFileHandle("/", handle));
-        EXPECT_FALSE(makeFileHandle(path, handle));
-        EXPECT_EQ(handle, FileHandle());
-    }
-    EXPECT_EQ(urlFromFileHandle(FileHandle()), nullptr);
-    FileHandle noise;
-    noise.bytes.fill(std::byte(0x2F));
-    EXPECT_EQ(urlFromFileHandle(noise), nullptr);
-}
-
-TEST(HomeDirectory, IsThatOfTheUserDatabase)
-{
-    EXPECT_EQ(homeDirectory("root").utf8(), "/root");
-    EXPECT_TRUE(homeDirectory("no-such-user").isNull());
-    ::setenv("HOME", "/elsewhere", 1);
-    EXPECT_NE(homeDirectory("").utf8(), "/elsewhere");
 }
 
 TEST(SymbolicLinks, AreResolvedAsFarAsThePathExists)
@@ -103,30 +65,6 @@ TEST(SymbolicLinks, AreResolvedAsFarAsThePathExists)
     EXPECT_EQ(filePathURL(nullptr), nullptr);
 }
 
-TEST(VolumeIdentifier, IsSharedByTheItemsOfAVolume)
-{
-    const TemporaryFolder folder;
-    const auto ofFolder = volumeIdentifier(*urlOf(folder.path(), true));
-    const auto ofFile = volumeIdentifier(*urlOf(folder.write("a", "")));
-    const auto ofOther = volumeIdentifier(*urlOf("/proc/self/status"));
-    ASSERT_TRUE(ofFolder && ofFile && ofOther);
-    EXPECT_EQ(*ofFolder, *ofFile);
-    EXPECT_NE(*ofFolder, *ofOther);
-    EXPECT_EQ(volumeIdentifier(*urlOf(folder / "missing")), nullptr);
-}
-
-TEST(FilePackage, IsAFolderWithAPackageExtension)
-{
-    const TemporaryFolder folder;
-    for (const char* name : {"Song.fuguex", "Old.BAND", "plain", ".fuguex", "Song.txt"})
-        fs::create_directory(folder / name);
-    folder.write("file.fuguex", "");
-    const auto isPackage = [&](const char* name) { return isFilePackage(String::fromUTF8(folder / name)); };
-    EXPECT_TRUE(isPackage("Song.fuguex") && isPackage("Old.BAND"));
-    EXPECT_FALSE(isPackage("plain") || isPackage(".fuguex") || isPackage("Song.txt"));
-    EXPECT_FALSE(isPackage("file.fuguex") || isPackage("missing.fuguex") || isFilePackage(nullptr));
-}
-
 TEST(DisplayName, ComesFromDesktopEntriesInTheUsersLanguage)
 {
     const TemporaryFolder folder;
@@ -134,17 +72,14 @@ TEST(DisplayName, ComesFromDesktopEntriesInTheUsersLanguage)
     const std::string entry = folder.write("music/.directory", "# a comment\n[Other]\nName=Wrong\n[Desktop Entry]\n"
                                                                "Name = My\\sMusic\r\nName[de]=Meine Musik\n"
                                                                "Name[de_AT]=Mei Musi\nName[sr@latin]=Muzika\n");
-    struct Case {
-        const char* locale;
-        const char* expected;
-    };
-    for (const Case c : {Case{"C", "My Music"},
-                         {"de_DE.UTF-8", "Meine Musik"},
-                         {"de_AT", "Mei Musi"},
-                         {"sr_RS.UTF-8@latin", "Muzika"},
-                         {"fr_FR", "My Music"}}) {
-        ::setenv("LC_ALL", c.locale, 1);
-        EXPECT_EQ(displayName(*urlOf(folder / "music", true)).utf8(), c.expected) << c.locale;
+    const std::pair<const char*, const char*> cases[] = {{"C", "My Music"},
+                                                         {"de_DE.UTF-8", "Meine Musik"},
+                                                         {"de_AT", "Mei Musi"},
+                                                         {"sr_RS.UTF-8@latin", "Muzika"},
+                                                         {"fr_FR", "My Music"}};
+    for (const auto& [locale, expected] : cases) {
+        ::setenv("LC_ALL", locale, 1);
+        EXPECT_EQ(displayName(*urlOf(folder / "music", true)).utf8(), expected) << locale;
     }
     ::unsetenv("LC_ALL");
     EXPECT_EQ(displayName(*urlOf(folder.write("x.wav", ""))).utf8(), "x.wav");

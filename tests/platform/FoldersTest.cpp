@@ -12,33 +12,6 @@ using namespace platform;
 
 namespace {
 
-TEST(Folders, NamesAreSortedAndWhole)
-{
-    const TemporaryFolder folder;
-    for (const char* name : {"b", "B", ".hidden", "\xFF"})
-        folder.write(name, "");
-    EXPECT_EQ(namesInFolder(folder.path()), (std::vector<std::string>{".hidden", "B", "b", "\xFF"}));
-    EXPECT_EQ(namesInFolder(folder / "b"), std::nullopt);
-    EXPECT_EQ(errno, ENOTDIR);
-}
-
-TEST(Folders, CreatedAsFarAsTheyAreMissing)
-{
-    const TemporaryFolder folder;
-    folder.write("file", "");
-    fs::create_directory(folder / "real");
-    fs::create_directory_symlink("real", folder / "link");
-    fs::create_directory_symlink("nowhere", folder / "broken");
-    EXPECT_TRUE(createFolders(folder / "a/b/c"));
-    EXPECT_TRUE(createFolders(folder / "a/b/c"));
-    EXPECT_TRUE(createFolders(folder / "link/x"));
-    EXPECT_TRUE(fs::is_directory(folder / "real/x"));
-    for (const char* name : {"file", "file/x", "broken/x"}) {
-        EXPECT_FALSE(createFolders(folder / name)) << name;
-        EXPECT_EQ(errno, ENOTDIR) << name;
-    }
-}
-
 TEST(Folders, RemovalStaysInsideAndTellsOfFailure)
 {
     const TemporaryFolder folder;

@@ -114,13 +114,4 @@ TEST(PropertyListBinary, ALongTextUsedVeryOftenReadsBack)
     EXPECT_TRUE(readPropertyList(*bytes) == value);
 }
 
-TEST(PropertyListBinary, KeysAreWrittenOnce)
-{
-    const auto bytes = writePropertyList(Array(100, Dictionary{{"a long name of a key", "a long name of a key"}}),
-                                         PropertyListFormat::binary);
-    const std::string_view text = textOf(*bytes);
-    EXPECT_EQ(text.find("a long name"), text.rfind("a long name"));
-    EXPECT_LT(bytes->size(), 700U);
-}
-
 } // namespace

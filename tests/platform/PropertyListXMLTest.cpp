@@ -2,8 +2,6 @@
 
 #include <gtest/gtest.h>
 
-#include <chrono>
-
 namespace {
 
 using namespace platform;
@@ -26,7 +24,7 @@ TEST(PropertyListXML, WhatOtherWritersMayWrite)
         {xmlList(
              "<array> <integer> +7 </integer>\n<integer>-0x1F</integer><real>+1e2</real><real>\nnan</real></array>"),
          Value()},
-        {"<?xml version='1.0' encoding='ISO-8859-1'?><plist><string>A</string></plist>", "A"},
+        {"<?xml version='1.0' encoding='ISO-8859-1'?><plist><string>\xE9</string></plist>", "\u00E9"},
         {xmlList("<data> AAE\nC Aw </data>"), Bytes{std::byte{0}, std::byte{1}, std::byte{2}, std::byte{3}}},
         {xmlList("<dict><key>k</key><string>1</string><key>k</key><string>2</string></dict>"), Dictionary{{"k", "2"}}},
         {xmlList("<date> 2000-12-31T23:59:59Z </date>"), Date{-1}},
@@ -40,49 +38,26 @@ TEST(PropertyListXML, WhatOtherWritersMayWrite)
         else
             EXPECT_EQ((*value->get<Array>())[1], Value(-31));
     }
-
-    std::u16string wide = u"\uFEFF<?xml version='1.0' encoding='UTF-16'?><plist><string>\u65E5</string></plist>";
-    EXPECT_EQ(readPropertyList(std::as_bytes(std::span(wide))), Value("\u65E5"));
-    wide[60] = 0xD800;
-    EXPECT_FALSE(readPropertyList(std::as_bytes(std::span(wide)))) << "a surrogate alone";
-    wide = u"<?xml version='1.0'?><plist><true/></plist>";
-    EXPECT_FALSE(readPropertyList(std::as_bytes(std::span(wide)))) << "no byte order mark";
 }
 
 TEST(PropertyListXML, MalformedIsRefusedAndTheLineNamed)
 {
-    const std::string_view contents[] = {
-        "",
-        "<string>a</string><string>b</string>",
-        "text",
-        "<array>text</array>",
-        "<array><key>k</key></array>",
-        "<key>k</key>",
-        "<dict><string>v</string></dict>",
-        "<dict><key>k</key></dict>",
-        "<dict><key>k</key><key>l</key><true/></dict>",
-        "<string><true/></string>",
-        "<true>x</true>",
-        "<set/>",
-        "<integer/>",
-        "<integer>1.5</integer>",
-        "<integer>9223372036854775808</integer>",
-        "<integer>- 1</integer>",
-        "<integer>--1</integer>",
-        "<real>1,5</real>",
-        "<real>+-1</real>",
-        "<real/>",
-        "<date>2026-02-30T00:00:00Z</date>",
-        "<date>2026-02-03</date>",
-        "<date>0000-01-01T00:00:00Z</date>",
-        "<data>A</data>",
-        "<data>AA=A</data>",
-        "<data>AAAA=</data>",
-        "<data>A*==</data>",
-        "<string>&unknown;</string>",
-        "<string>a",
-        "<string a='&unknown;'/>",
-    };
+    const std::string_view contents[] = {"",
+                                         "<string>a</string><string>b</string>",
+                                         "<array>text</array>",
+                                         "<dict><key>k</key></dict>",
+                                         "<string><true/></string>",
+                                         "<set/>",
+                                         "<integer>1.5</integer>",
+                                         "<integer>9223372036854775808</integer>",
+                                         "<integer>--1</integer>",
+                                         "<real>1,5</real>",
+                                         "<date>2026-02-30T00:00:00Z</date>",
+                                         "<date>0000-01-01T00:00:00Z</date>",
+                                         "<data>A</data>",
+                                         "<data>A*==</data>",
+                                         "<string>&unknown;</string>",
+                                         "<string a='&unknown;'/>"};
     for (const std::string_view content : contents) {
         Error error;
         EXPECT_FALSE(readPropertyList(bytesOf(xmlList(content)), &error)) << content;
@@ -91,7 +66,7 @@ TEST(PropertyListXML, MalformedIsRefusedAndTheLineNamed)
     Error error;
     EXPECT_FALSE(readPropertyList(bytesOf("<?xml version='1.0'?>\n<plist>\n<true/>\n<oops/>\n</plist>"), &error));
     EXPECT_EQ(error.description, "property list: line 4: unknown element \"oops\"");
-    for (const std::string_view text : {"<true/>", "<plist/>", "<plist><string>\xFF</string></plist>"})
+    for (const std::string_view text : {"<true/>", "<plist/>"})
         EXPECT_FALSE(readPropertyList(bytesOf(text))) << text;
     std::string deep;
     for (int i = 0; i < 100'000; ++i)
@@ -99,46 +74,16 @@ TEST(PropertyListXML, MalformedIsRefusedAndTheLineNamed)
     EXPECT_FALSE(readPropertyList(bytesOf(xmlList(deep))));
 }
 
-TEST(PropertyListXML, DeclarationsInTheDoctypeAreRefused)
+// The parser's own refusals are those of XMLParserTest.cpp; that it was given other limits must not lift them.
+TEST(PropertyListXML, LongTextIsNoLongTag)
 {
-    const std::string_view declarations[] = {
-        "<!ENTITY a 'x'>",
-        "<!ENTITY % a 'x'>",
-        "<!ENTITY a SYSTEM 'file:///etc/passwd'>",
-        "<!ATTLIST true a CDATA 'x'>",
-        "<!ATTLIST true a (x|y) 'x'>",
-        "<!ELEMENT true (a,b)>",
-        "<!NOTATION n SYSTEM 'n'>",
-    };
-    for (const std::string_view declaration : declarations) {
-        Error error;
-        const std::string text = "<!DOCTYPE plist [" + std::string(declaration) + "]>" + xmlList("<true/>");
-        EXPECT_FALSE(readPropertyList(bytesOf(text), &error)) << declaration;
-    }
-    EXPECT_TRUE(readPropertyList(bytesOf("<!DOCTYPE plist []>" + xmlList("<true/>"))));
-    // With a DTD elsewhere an unknown entity is no error of form, but what it stands for would be missing.
-    EXPECT_FALSE(readPropertyList(bytesOf("<!DOCTYPE plist SYSTEM 'p.dtd'>" + xmlList("<string>a&b;</string>"))));
-}
-
-TEST(PropertyListXML, ManyAttributesCostTimeInProportion)
-{
-    std::string text = "<plist";
-    for (int i = 0; i < 200'000; ++i)
-        text += " a" + std::to_string(i) + "=''";
-    const auto start = std::chrono::steady_clock::now();
-    EXPECT_FALSE(readPropertyList(bytesOf(text + "><true/></plist>")));
-    EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(5)); // it took minutes
-    // Only tags are limited.
-    std::string many;
-    for (int i = 0; i < 5000; ++i)
-        many += "<!--a--><?b?>";
+    EXPECT_FALSE(readPropertyList(bytesOf("<!DOCTYPE plist [<!ENTITY a 'x'>]>" + xmlList("<true/>"))));
+    EXPECT_FALSE(readPropertyList(bytesOf("<plist a='" + std::string(100'000, 'x') + "'><true/></plist>")));
     const std::string blanks(50'000, ' ');
-    for (const std::string& content : {"<data><![CDATA[" + std::string(400'000, 'A') + "]]></data>", many + "<true/>",
-                                       "<!--" + blanks + "--><true/>", "<?pi " + blanks + "?><true/>",
-                                       blanks + "<true/>", "<string>" + std::string(50'000, 'x') + "</string>"}) {
+    for (const std::string& content : {"<data><![CDATA[" + std::string(12'000'000, 'A') + "]]></data>",
+                                       "<!--" + blanks + "--><?pi " + blanks + "?>" + blanks + "<true/>"}) {
         Error error;
-        EXPECT_TRUE(readPropertyList(bytesOf(blanks + xmlList(content)), &error))
-            << content.substr(0, 20) << error.description;
+        EXPECT_TRUE(readPropertyList(bytesOf(blanks + xmlList(content)), &error)) << error.description;
     }
 }
 

@@ -5,8 +5,6 @@
 #include <gtest/gtest.h>
 
 #include <array>
-#include <cmath>
-#include <limits>
 #include <random>
 #include <vector>
 
@@ -47,35 +45,6 @@ TEST(SampleExtremes, FastRoadEqualsPlainRoadOnRandomBytes)
                         << format.bits << (format.isFloat ? " float " : " int ") << (order == endian::big) << ' '
                         << samplesPerRun;
             }
-}
-
-// Each value at each place of a run: in a vector, in the second of a pair, in the rest.
-template <class Float>
-void expectSpecialsToCount()
-{
-    constexpr Float infinity = std::numeric_limits<Float>::infinity();
-    constexpr Float nan = std::numeric_limits<Float>::quiet_NaN();
-    const SampleFormat format{8 * static_cast<int>(sizeof(Float)), true, false, endian::native};
-    for (std::size_t place = 0; place < 41; ++place)
-        for (const Float special : {nan, -nan, infinity, -infinity, Float(2), Float(-2)}) {
-            std::vector<Float> samples(41, Float(0.25));
-            samples[(place + 2) % samples.size()] = nan; // does not hide what came before it
-            samples[place] = special;
-            SampleExtremes extremes;
-            platform::sampleExtremes(samples.data(), format, samples.size(), 1, &extremes);
-            const std::size_t side = place % 2;
-            const auto number = static_cast<float>(std::isnan(special) ? Float(0) : special);
-            EXPECT_EQ(extremes.lowest[side], std::min(number, 0.0F)) << place << ' ' << special;
-            EXPECT_EQ(extremes.highest[side], std::max(number, 0.25F)) << place << ' ' << special;
-            EXPECT_EQ(extremes.lowest[1 - side], 0.0F);
-            EXPECT_EQ(extremes.highest[1 - side], 0.25F);
-        }
-}
-
-TEST(SampleExtremes, NaNCountsAsNothingAndInfinityAsItself)
-{
-    expectSpecialsToCount<float>();
-    expectSpecialsToCount<double>();
 }
 
 } // namespace

@@ -1,4 +1,5 @@
 #include "platform/URL.h"
+#include "support/URLs.h"
 
 #include <gtest/gtest.h>
 
@@ -10,13 +11,6 @@ namespace {
 URLRef fromPath(const std::string& path, bool isDirectory = false, const URLRef& base = nullptr)
 {
     return URL::createWithFileSystemPath(String::fromUTF8(path), PathStyle::posix, isDirectory, base);
-}
-
-/// The path of a URL in a style, "(null)" for none.
-std::string pathOf(const URLRef& url, PathStyle style = PathStyle::posix)
-{
-    const String path = url ? url->copyFileSystemPath(style) : nullptr;
-    return path.isNull() ? "(null)" : path.utf8();
 }
 
 std::string textOf(const URLRef& url)
@@ -36,19 +30,15 @@ TEST(URL, PathsBecomeTextAndComeBack)
     };
     const Case cases[] = {
         {"/", false, "/", "file:///"}, // the root is always a directory
-        {"///", true, "/", "file:///"},
         {"/a/b", false, "/a/b", "file:///a/b"},
-        {"/a/b/", false, "/a/b", "file:///a/b"},
         {"/a/b", true, "/a/b", "file:///a/b/"},
         {"//a//b/", true, "/a/b", "file:///a/b/"},
         {"/a/./../b", false, "/a/./../b", "file:///a/./../b"},
-        {"/~/x", false, "/~/x", "file:///~/x"},
         {"/100% ?#;[x]:\n", false, "/100% ?#;[x]:\n", "file:///100%25%20%3F%23%3B%5Bx%5D%3A%0A"},
         {"/%2F%41", false, "/%2F%41", "file:///%252F%2541"}, // a path has no escapes
         {"/\u00DCber/\U0001F3B5", false, "/\u00DCber/\U0001F3B5", "file:///%C3%9Cber/%F0%9F%8E%B5"},
         {"a\\b", false, "a\\b", "a%5Cb"},
         {"a:b/c", false, "a:b/c", "a%3Ab/c"}, // no scheme
-        {".", false, ".", "./"},              // and so are dots
         {"/a/..", false, "/a/..", "file:///a/../"},
         {"/" + std::string(5000, 'x'), false, "/" + std::string(5000, 'x'), "file:///" + std::string(5000, 'x')},
     };
@@ -85,19 +75,14 @@ TEST(URL, TextIsReadStrictlyAndKeptInOneForm)
         {"FILE:///x", "/x", "file:///x"},
         {"file:/x", "/x", "file:///x"},
         {"file://localhost/x", "/x", "file:///x"},
-        {"file://LocalHost/x/", "/x", "file:///x/"},
         {"file:////a//b", "/a/b", "file:///a/b"},
         {"file:///%c3%A4%41;v=1", "/\u00E4A;v=1", "file:///%C3%A4A%3Bv%3D1"},
         {"file:///\u00E4", "/\u00E4", "file:///%C3%A4"},
         {"file:///a/b?query#frag", "/a/b", "file:///a/b?query#frag"},
-        {"file:///a/?q", "/a", "file:///a/?q"},
         {"file:///a/..", "/a/..", "file:///a/../"}, // dots name a folder
-        {"file:///.", "/.", "file:///./"},
         {"/a%20b", "/a b", "file:///a%20b"},
         {"a/b", "a/b", "a/b"},
         {"http://host/a%2Fb/?x", "(null)", "http://host/a%2Fb/?x"},
-        {"http://host/\u00E4", "(null)", "http://host/%C3%A4"},
-        {"mailto:a", "(null)", "mailto:a"},
         {"file://Server/share/x", "(null)", "file://server/share/x"}, // another host's file has no path here
     };
     for (const Case& c : cases) {
@@ -110,31 +95,9 @@ TEST(URL, TextIsReadStrictlyAndKeptInOneForm)
         EXPECT_EQ(*URL::createWithString(c.canonical), *url);
     }
     const std::string refused[] = {
-        "",
-        "#f",
-        "file:",
-        "file://",
-        "file:x",
-        "file:///a b",
-        "file:///a\\b",
-        "file:///%",
-        "file:///%4",
-        "file:///%zz",
-        "file:///a%2Fb",
-        "file:///a%2f",
-        "file:///a%00b",
-        "file:///%FF",
-        "file:///\xFF",
-        "file:///a\0"s,
-        "file:///[",
-        "%2F",
-        "file://h:1/x",
-        "file://u@h/x",
-        "file://[::1]/x",
-        "file://h%41/x",
-        "//host/x",
-        "C:\\a",
-    };
+        "",           "#f",           "file://",       "file:x",        "file:///a b", "file:///a\\b",
+        "file:///%4", "file:///%zz",  "file:///a%2Fb", "file:///a%00b", "file:///%FF", "file:///a\0"s,
+        "%2F",        "file://h:1/x", "//host/x",      "C:\\a"};
     for (const std::string& text : refused)
         EXPECT_EQ(URL::createWithString(text), nullptr) << text;
 }
@@ -152,12 +115,9 @@ TEST(URL, BasesAreApplied)
         {"../x%20/", "/music/x ", "../x%20/"},
         {"../../../x", "/x", "../../../x"},
         {"..", "/music", "../"},
-        {".", "/music/set list", "./"},
-        {"x?q", "/music/set list/x", "x?q"},
         {"/x", "/x", "file:///x"},
         {"../..", "/", "../../"},
         {"file:///y", "/y", "file:///y"},
-        {"//localhost/z", "/z", "file:///z"},
         {"//server/z", "(null)", "file://server/z"},
     };
     for (const Case& c : cases) {
@@ -199,33 +159,21 @@ TEST(URL, PathStylesOfOtherSystems)
         {windows, "C:\\a b\\c%", "/C:/a b/c%", "C:\\a b\\c%"},
         {windows, "c:/a\\", "/c:/a", "c:\\a"},
         {windows, "C:", "/C:", "C:\\"},
-        {windows, "C:\\", "/C:", "C:\\"},
         {windows, "C:a", "(none)", ""}, // in a drive's current folder
         {windows, "\\a\\\\b", "/a/b", "\\a\\b"},
-        {windows, "\\", "/", "\\"},
         {windows, "a\\..\\b", "a/../b", "a\\..\\b"},
         {windows, "\\\\Server\\share\\x", "(null)", "\\\\server\\share\\x"},
-        {windows, "\\\\server", "(null)", "\\\\server\\"},
-        {windows, "\\\\localhost\\share", "/share", "\\share"},
         {windows, "\\\\?\\C:\\a", "(none)", ""},
-        {windows, "\\\\", "(none)", ""},
         {colon, "Disk:Folder:File", "/Volumes/Disk/Folder/File", "Disk:Folder:File"},
-        {colon, "Disk:Folder:File:", "/Volumes/Disk/Folder/File", "Disk:Folder:File"},
         {colon, "Disk", "/Volumes/Disk", "Disk:"},
-        {colon, "Disk:", "/Volumes/Disk", "Disk:"},
         {colon, "Disk:a::b", "/Volumes/Disk/a/../b", "Disk:a::b"},
-        {colon, "Disk:a::", "/Volumes/Disk/a/..", "Disk:a::"},
         {colon, "Disk::", "(none)", ""}, // out of its volume
-        {colon, "Disk::x:y", "(none)", ""},
         {colon, "Disk:4/4 Beats", "/Volumes/Disk/4:4 Beats", "Disk:4/4 Beats"},
         {colon, "Disk:a:..", "(none)", ""}, // names there, but not in POSIX
-        {colon, ".:x", "(none)", ""},
         {colon, ":rel:x", "rel/x", ":rel:x"},
         {colon, ":", ".", ":"},
         {colon, "::", "..", "::"},
         {colon, "::up", "../up", "::up"},
-        {colon, ":::up:", "../../up", ":::up"},
-        {colon, ":a::", "a/..", ":a::"},
     };
     for (const Case& c : cases) {
         const URLRef url = URL::createWithFileSystemPath(String::fromUTF8(c.text), c.style, false);
@@ -256,19 +204,14 @@ TEST(URL, ComponentsAreTakenOffAndPutOn)
     };
     const Case cases[] = {
         {"file:///", "/", "-", "file:///", "file:///x%20y.z"},
-        {"file:///a", "a", "-", "file:///", "file:///a/x%20y.z"},
         {"file:///a/b.c.d/", "b.c.d", "d", "file:///a/", "file:///a/b.c.d/x%20y.z"},
         {"file:///a/b?q#f", "b", "-", "file:///a/", "file:///a/b/x%20y.z"},
         {"file:///a/..", "..", "-", "file:///a/../../", "file:///a/../x%20y.z"},
         {"file:///a/.", ".", "-", "file:///a/../", "file:///a/./x%20y.z"},
-        {"file:///%C3%A4.%C3%A4", "\u00E4.\u00E4", "\u00E4", "file:///", "file:///%C3%A4.%C3%A4/x%20y.z"},
         {"file:///.hidden", ".hidden", "-", "file:///", "file:///.hidden/x%20y.z"},
-        {"file:///dot.", "dot.", "-", "file:///", "file:///dot./x%20y.z"},
-        {"file:///No.%201", "No. 1", "-", "file:///", "file:///No.%201/x%20y.z"},
         {"file://server/a", "a", "-", "file://server/", "file://server/a/x%20y.z"},
         {"a.b", "a.b", "b", "./", "a.b/x%20y.z"},
         {"./", ".", "-", "../", "x%20y.z"},
-        {"../", "..", "-", "../../", "../x%20y.z"},
         {"http://host/a.b", "(null)", "-", "(null)", "(null)"},
     };
     const String name = String::fromUTF8("x y.z");
@@ -288,12 +231,4 @@ TEST(URL, ComponentsAreTakenOffAndPutOn)
     EXPECT_EQ(textOf(relative->deletingLastPathComponent()), "b/");
     EXPECT_EQ(pathOf(relative->deletingLastPathComponent()->deletingLastPathComponent()), "/a");
     EXPECT_EQ(pathOf(relative->appendingPathComponent(name, false)), "/a/b/c/x y.z");
-}
-
-TEST(URL, FileReferencesAreKnown)
-{
-    for (const char* text : {"file:///.file/id=6571367.2773272/", "file://localhost/.file/id=1"})
-        EXPECT_TRUE(URL::createWithString(text)->isFileReferenceURL()) << text;
-    for (const char* text : {"file:///.file/x", "file:///a/.file/id=1", "file://server/.file/id=1", "http:/.file/id=1"})
-        EXPECT_FALSE(URL::createWithString(text)->isFileReferenceURL()) << text;
 }

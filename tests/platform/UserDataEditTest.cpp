@@ -5,8 +5,6 @@
 
 #include <algorithm>
 #include <filesystem>
-#include <functional>
-#include <map>
 
 using namespace platform;
 

@@ -4,17 +4,12 @@
 #include "platform/PropertyList.h"
 #include "project/ProjectInformation.h"
 #include "support/TemporaryFolder.h"
+#include "support/URLs.h"
 
 #include <gtest/gtest.h>
 
 #include <filesystem>
 #include <string>
-
-inline platform::URLRef urlOf(const std::string& path, bool isDirectory = true)
-{
-    return platform::URL::createWithFileSystemPath(platform::String::fromUTF8(path), platform::PathStyle::posix,
-                                                   isDirectory);
-}
 
 class PackageOnDisk {
 public:
@@ -25,7 +20,7 @@ public:
 
     std::string path() const { return folder_ / name_; }
     std::string operator/(std::string_view item) const { return path() + '/' + std::string(item); }
-    platform::URLRef url() const { return urlOf(path()); }
+    platform::URLRef url() const { return urlOf(path(), true); }
     const TemporaryFolder& folder() const { return folder_; }
 
     void moveTo(const std::string& name)

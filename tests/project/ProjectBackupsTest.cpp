@@ -8,8 +8,6 @@ namespace {
 
 using namespace platform;
 using Info = ProjectInformation;
-constexpr auto no = CreateDirectories::no;
-constexpr auto yes = CreateDirectories::yes;
 
 class Backups {
 public:
@@ -35,9 +33,9 @@ public:
             names.push_back(fs::path(backup.url->posixPath()).filename());
         return names;
     }
-    std::string next(int most, PurgeOldBackups purge, CreateDirectories create = no) const
+    std::string next(int most, PurgeOldBackups purge) const
     {
-        const URLRef url = Info::urlForNewBackupForBundleURL(package_.url(), 0, create, most, purge);
+        const URLRef url = Info::urlForNewBackupForBundleURL(package_.url(), 0, CreateDirectories::no, most, purge);
         return url ? fs::path(url->posixPath()).filename().string() : "none";
     }
     const PackageOnDisk& package() const { return package_; }
@@ -57,11 +55,7 @@ TEST(ProjectBackups, ListedByDateThenName)
     backups.package().write(Backups::item("file"), std::string_view());
     fs::create_symlink("circle", backups.path("circle"));
     EXPECT_EQ(backups.names(), (Names{"02", "10", "a", "b"}));
-    EXPECT_TRUE(Info::backupsForBundleURL(backups.package().url(), 1).empty());
     EXPECT_TRUE(Info::backupsForBundleURL(backups.package().url(), -1).empty());
-    EXPECT_TRUE(Info::backupsForBundleURL(nullptr, 0).empty());
-    const auto date = Info::modificationDateForVariantIndex(0, backups.package().url());
-    EXPECT_EQ(date, std::nullopt); // no project data of its own
 }
 
 TEST(ProjectBackups, NewNames)
@@ -75,18 +69,15 @@ TEST(ProjectBackups, NewNames)
         Names left;
     } cases[] = {
         {{}, 3, keep, "00", {}},
-        {{"00", "01"}, 3, keep, "02", {"00", "01"}},
         {{"02", "01"}, 3, keep, "00", {"02", "01"}}, // counting up comes round
         {{"00", "02"}, 4, keep, "03", {"00", "02"}}, // 2 is taken
         {{"00", "01", "02"}, 3, keep, "none", {"00", "01", "02"}},
         {{"00", "01", "02"}, 3, purge, "00", {"01", "02"}},
         {{"01", "02", "00"}, 3, purge, "01", {"02", "00"}}, // the oldest goes
         {{"00", "01", "02", "03"}, 2, purge, "01", {"03"}}, // as many as are too many
-        {{"00"}, 1, purge, "00", {}},
         {{"00"}, 0, purge, "none", {"00"}},
-        {{"00"}, -5, purge, "none", {"00"}},
         {{"00"}, 2147483647, purge, "01", {"00"}},
-        {{"mine", "00"}, 3, keep, "02", {"mine", "00"}},
+        {{"mine", "yours", "00"}, 3, keep, "none", {"mine", "yours", "00"}}, // 01 is free, but there are three
     };
     for (const auto& test : cases) {
         const Backups backups(test.there);
@@ -94,19 +85,6 @@ TEST(ProjectBackups, NewNames)
         EXPECT_EQ(backups.names(), test.left);
         EXPECT_TRUE(std::string_view(test.name) == "none" || !fs::exists(backups.path(test.name)));
     }
-}
-
-TEST(ProjectBackups, NewFolders)
-{
-    const Backups backups({"00"});
-    EXPECT_EQ(backups.next(5, PurgeOldBackups::no, yes), "01");
-    EXPECT_TRUE(fs::is_directory(backups.path("01")));
-    EXPECT_EQ(backups.next(5, PurgeOldBackups::no, yes), "01"); // still empty: nobody's
-    backups.package().write(Backups::item("01") + "/half", std::string_view("a backup"));
-    EXPECT_EQ(backups.next(5, PurgeOldBackups::no), "02");
-    const PackageOnDisk fresh;
-    EXPECT_TRUE(Info::urlForNewBackupForBundleURL(fresh.url(), 3, yes, 5, PurgeOldBackups::no));
-    EXPECT_TRUE(fs::is_directory(fresh / "Alternatives/003/Project File Backups/00"));
 }
 
 TEST(ProjectBackups, ADeletionCutShortLeavesNoHalfBackup)

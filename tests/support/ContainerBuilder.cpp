@@ -73,6 +73,28 @@ Bytes ContainerBuilder::bytes(std::optional<std::uint32_t> storedSize) const
     return image.take();
 }
 
+Bytes waveFormat(int tag, int channels, int rate, int blockAlign, int bits)
+{
+    ByteWriter out(std::endian::little);
+    out.write(static_cast<std::uint16_t>(tag));
+    out.write(static_cast<std::uint16_t>(channels));
+    out.write(static_cast<std::uint32_t>(rate));
+    out.write(static_cast<std::uint32_t>(rate * blockAlign));
+    out.write(static_cast<std::uint16_t>(blockAlign));
+    out.write(static_cast<std::uint16_t>(bits));
+    return out.take();
+}
+
+Bytes cafDescription(double rate, std::string_view format, const std::array<std::uint32_t, 5>& numbers)
+{
+    ByteWriter out;
+    out.write(rate);
+    out.write(bytesOf(format));
+    for (const std::uint32_t number : numbers)
+        out.write(number);
+    return out.take();
+}
+
 std::int32_t openInMemory(CAudioFileIO& file, BytesView content, unsigned int mode)
 {
     auto block = std::make_shared<KTMem>(content.size());

@@ -5,6 +5,7 @@
 #include "audiofile/CAudioFileIO.h"
 #include "platform/core/ByteWriter.h"
 
+#include <array>
 #include <optional>
 #include <string_view>
 
@@ -35,8 +36,19 @@ private:
     bool isCAF_;
 };
 
+/// The body of a "fmt " chunk of 16 bytes.
+Bytes waveFormat(int tag, int channels, int rate, int blockAlign, int bits);
+/// The body of a CAF "desc" chunk. The numbers: flags, bytes and frames in a packet, channels, bits.
+Bytes cafDescription(double rate, std::string_view format, const std::array<std::uint32_t, 5>& numbers);
+
 /// Opens a memory file that holds a copy of the bytes.
 std::int32_t openInMemory(CAudioFileIO& file, BytesView content, unsigned int mode = kFileIOReadWrite);
+struct MemoryAudioFile : CAudioFileIO {
+    explicit MemoryAudioFile(BytesView content, unsigned int mode = kFileIOReadWrite)
+    {
+        openInMemory(*this, content, mode);
+    }
+};
 /// What an open memory file holds.
 BytesView contentOf(const CAudioFileIO& file);
 /// The chunks as ForEachChunk lists them: "fmt :16 data:4".

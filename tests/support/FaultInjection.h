@@ -9,6 +9,9 @@
 #include <cstdint>
 #include <limits>
 
+#include <signal.h>
+#include <unistd.h>
+
 /// Restores the call table when it goes out of scope: assign to `platform::systemCalls()` freely meanwhile.
 class SystemCallGuard {
 public:
@@ -33,11 +36,9 @@ enum class Call {
     fsync,
     preallocate,
     syncFolder,
-    createFolder,
     renameWithoutReplacing,
     exchangeNames,
     removeFile,
-    removeFolder,
     count
 };
 
@@ -56,11 +57,9 @@ public:
         calls.fsync = intercept<Call::fsync, &SystemCalls::fsync>;
         calls.preallocate = intercept<Call::preallocate, &SystemCalls::preallocate>;
         calls.syncFolder = intercept<Call::syncFolder, &SystemCalls::syncFolder>;
-        calls.createFolder = intercept<Call::createFolder, &SystemCalls::createFolder>;
         calls.renameWithoutReplacing = intercept<Call::renameWithoutReplacing, &SystemCalls::renameWithoutReplacing>;
         calls.exchangeNames = intercept<Call::exchangeNames, &SystemCalls::exchangeNames>;
         calls.removeFile = intercept<Call::removeFile, &SystemCalls::removeFile>;
-        calls.removeFolder = intercept<Call::removeFolder, &SystemCalls::removeFolder>;
         calls.pread = transfer<Call::pread, &SystemCalls::pread>;
         calls.pwrite = transfer<Call::pwrite, &SystemCalls::pwrite>;
         // Like the system's, a close that fails has closed.
@@ -78,6 +77,8 @@ public:
         Plan& plan = of(call);
         plan = {plan.calls + nth, plan.calls + nth + times, error, plan.calls};
     }
+    /// The process is killed ahead of its `nth` call that changes something (1 is the next).
+    void killAt(int nth) { changesUntilKilled_ = nth; }
     /// Every transfer moves at most `bytes` bytes.
     void limitTransfers(std::size_t bytes) { limit_ = bytes; }
     /// Calls made since construction, failed ones included.
@@ -92,6 +93,10 @@ private:
     static int failed() { return errno == 0 ? 0 : -1; }
     static bool hit(Call call)
     {
+        const bool changes = call == Call::createFile || call == Call::pwrite || call == Call::removeFile ||
+                             call == Call::renameWithoutReplacing || call == Call::exchangeNames;
+        if (changes && current_->changesUntilKilled_ > 0 && --current_->changesUntilKilled_ == 0)
+            ::kill(::getpid(), SIGKILL);
         Plan& plan = current_->of(call);
         ++plan.calls;
         if (plan.calls < plan.first || plan.calls >= plan.end)
@@ -113,5 +118,6 @@ private:
     inline static FaultInjector* current_ = nullptr;
     SystemCallGuard guard_;
     std::array<Plan, static_cast<std::size_t>(Call::count)> plans_;
+    int changesUntilKilled_ = 0;
     std::size_t limit_ = std::numeric_limits<std::size_t>::max();
 };

@@ -16,13 +16,21 @@ inline std::string toHex(BytesView bytes)
     return text;
 }
 
-/// Pairs of hex digits; throws on anything else.
-inline Bytes fromHex(std::string_view hex)
+/// Hex digits as `toHex` writes them, without the blanks that group them for the reader.
+inline std::string hex(std::string grouped)
 {
-    if (hex.size() % 2 != 0)
+    std::erase(grouped, ' ');
+    return grouped;
+}
+
+/// Pairs of hex digits, with blanks among them; throws on anything else.
+inline Bytes fromHex(std::string_view grouped)
+{
+    const std::string digits = hex(std::string(grouped));
+    if (digits.size() % 2 != 0)
         throw std::invalid_argument("odd number of hex digits");
     Bytes bytes;
-    for (std::size_t i = 0; i < hex.size(); i += 2)
-        bytes.push_back(static_cast<std::byte>(std::stoi(std::string(hex.substr(i, 2)), nullptr, 16)));
+    for (std::size_t i = 0; i < digits.size(); i += 2)
+        bytes.push_back(static_cast<std::byte>(std::stoi(digits.substr(i, 2), nullptr, 16)));
     return bytes;
 }

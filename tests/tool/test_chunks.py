@@ -30,12 +30,6 @@ class List(CommandTest):
         several = self.json("chunks", "a.wav", "missing", "d.caf", status=1)
         self.assertEqual([item.get("error", item["path"]) for item in several], ["a.wav", "file not found", "d.caf"])
 
-    def test_table(self):
-        self.write("a.wav", wave() + b"more")
-        self.assertEqual(self.on_terminal("chunks", "a.wav", NO_COLOR="1")[0],
-                         "a.wav  RIFF, 244 bytes\nID    OFFSET    SIZE\nfmt       12      16\n"
-                         "data      36     200\n4 bytes follow the container\n")
-
     def test_what_is_no_container(self):
         self.write("text.wav", b"no audio file at all")
         self.write("empty.wav", b"")
@@ -86,14 +80,6 @@ class Get(CommandTest):
         self.assertIn("is a folder", self.failure("chunks", "get", "a.wav", "note", "-o", "."))
         self.assertIn("file not found", self.failure("chunks", "get", "a.wav", "note", "-o", "none/out"))
         self.assert_no_litter("a.wav", "link", "out")
-
-    def test_terminal_gets_text_only(self):
-        self.write("a.wav", wave(chunk(b"note", "Küche".encode())))
-        self.assertEqual(self.on_terminal("chunks", "get", "a.wav", "note"), ("Küche", 0))
-        text, status = self.on_terminal("chunks", "get", "a.wav", "fmt")
-        self.assertIn("is not text", text)
-        self.assertEqual(status, 1)
-        self.assertEqual(self.on_terminal("chunks", "get", "a.wav", "fmt", "-o", "-")[1], 0)
 
 
 if __name__ == "__main__":

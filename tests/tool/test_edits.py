@@ -108,17 +108,6 @@ class Edits(CommandTest):
         self.add("a.wav", "note", "--in-place")
         self.assertEqual((self.folder / "b.wav").read_bytes(), wave(chunk(b"note", b"text")))
 
-    def test_dry_run_and_reports(self):
-        path = self.write("a.wav", wave())
-        result = self.add("a.wav", "note", "--dry-run")
-        self.assertEqual(result.stdout, b'a.wav: would add chunk "note", 4 bytes\n')
-        self.assertEqual(path.read_bytes(), wave())
-        self.assertEqual(self.json("chunks", "add", "a.wav", "note", stdin=b"text"),
-                         {"path": "a.wav", "action": "add", "id": "note", "count": 1, "size": 4, "replaced": 0,
-                          "dryRun": False})
-        self.assertEqual(self.add("a.wav", "note", "--quiet").stdout, b"")
-        self.assertEqual(self.lines("chunks", "remove", "a.wav", "note"), ['a.wav: removed 2 chunks "note", 8 bytes'])
-
     def test_backups_are_never_overwritten(self):
         for options in ([], ["--in-place"]):
             path = self.write("a.wav", wave())

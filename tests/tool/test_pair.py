@@ -55,25 +55,12 @@ class LongInfo(CommandTest):
             path = self.write(name, wave())
             os.utime(path, (0, 1705320000))  # 2024-01-15 12:00:00 UTC
 
-    def test_lines(self):
-        lines = self.lines("info", "--long", "Bass.L.wav", "alone.war", "named.mid")
-        self.assertEqual([line.split("\t")[6:] for line in lines], [
-            ["WAVE", "2024-01-15T12:00:00Z", "Bass.R.wav", "there"],
-            ["WAVE", "2024-01-15T12:00:00Z", "alone.wal", "missing"],
-            ["Midi", "2024-01-15T12:00:00Z", "", ""]])
-
     def test_json_has_them_always(self):
         stereo, plain = self.json("info", "Bass.R.wav", "named.mid")
         self.assertEqual((stereo["typeByName"], stereo["modified"], stereo["stereoPartner"],
                           stereo["stereoPartnerExists"]), ("WAVE", "2024-01-15T12:00:00Z", "Bass.L.wav", True))
         self.assertEqual((plain["typeByName"], plain["fileType"]), ("Midi", "WAVE"))
         self.assertNotIn("stereoPartner", plain)
-
-    def test_the_table_is_in_local_time(self):
-        text, _ = self.on_terminal("info", "-l", "alone.war", NO_COLOR="1", TZ="Asia/Kolkata")
-        title, row = text.splitlines()
-        self.assertTrue(title.endswith("CHANNELS  BY NAME  MODIFIED          STEREO PARTNER"), title)
-        self.assertTrue(row.endswith("mono      WAVE     2024-01-15 17:30  alone.wal (missing)"), row)
 
 
 if __name__ == "__main__":

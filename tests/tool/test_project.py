@@ -7,7 +7,7 @@ import threading
 import time
 import unittest
 
-from command import KTFILES, MEDIA, CommandTest
+from command import KTFILES, CommandTest
 
 ALTERNATIVE = "Alternatives/001/"
 BACKUPS = ALTERNATIVE + "Project File Backups/"
@@ -58,13 +58,6 @@ class Show(ProjectTest):
         counts = {item["key"]: (item["count"], item["missing"]) for item in second["media"]}
         self.assertEqual((counts["AudioFiles"], counts["VideoFiles"], counts["PlaybackFiles"]), ((2, 1), (1, 1), (0, 0)))
 
-    def test_table_and_lines(self):
-        text = self.on_terminal("project", "Song.fuguex", NO_COLOR="1")[0]
-        self.assertIn("version 2, saved from Studio 1.0, media in the package\n", text)
-        self.assertIn("*   1  Other\n       98.5 BPM, C major, 3/4, 12 tracks, 48 kHz\n       audio: 2, 1 missing\n", text)
-        self.assertEqual(self.lines("project", "Song.fuguex")[1],
-                         "1\tactive\tOther\t98.5\tC\tmajor\t3/4\t12\t48000\t3\t2\t0")
-
     def test_media(self):
         media = str(self.package / "Media")
         self.assertEqual(self.lines("project", "media", "Song.fuguex"),
@@ -77,17 +70,6 @@ class Show(ProjectTest):
 
     def json(self, *arguments, **options):
         return json.loads(self.run_command(*arguments, "--json", **options).stdout)
-
-    def test_dirs(self):
-        before = self.json("project", "dirs", "Song.fuguex")
-        self.assertEqual((before["directoryType"], before["layout"], len(before["directories"])), (0, 1, 17))
-        self.assertEqual([item["type"] for item in before["directories"] if item["exists"]], [14, 15])
-        after = self.json("project", "dirs", "--create", "Song.fuguex")
-        self.assertTrue(all(item["exists"] for item in after["directories"]))
-        self.assertTrue((self.package / "Alternatives/001/Undo Data.nosync").is_dir())
-        os.mkdir(self.folder / "Old.band")
-        self.run_command("project", "dirs", "--create", "Old.band")
-        self.assertTrue((self.folder / "Old.band/Sampler/Sampler Files").is_dir())
 
     def test_what_is_no_package(self):
         (self.folder / "Empty.fuguex").mkdir()
@@ -125,15 +107,6 @@ class Edits(ProjectTest):
         self.put(BACKUPS + "05/MetaData.plist", b"")
         self.assertIn("This backup is missing data and cannot not be restored.",
                       self.failure("project", "restore", "Song.fuguex", "05"))
-
-    def test_keep(self):
-        for number in range(4):
-            self.put(ALTERNATIVE + "ProjectData", str(number).encode())
-            stamp = time.time() - 1000 + number
-            os.utime(self.package / ALTERNATIVE / "ProjectData", (stamp, stamp))
-            self.run_command("project", "backup", "Song.fuguex", "--keep", "2")
-        kept = sorted(self.read(BACKUPS + name + "/ProjectData") for name in os.listdir(self.package / BACKUPS))
-        self.assertEqual(kept, [b"2", b"3"])
 
     def test_failed_backup_leaves_nothing(self):
         self.run_command("project", "backup", "Song.fuguex")
@@ -184,13 +157,6 @@ class Edits(ProjectTest):
         for run in runs:
             run.join()
         self.assertEqual(sorted(os.listdir(self.package / BACKUPS)), ["00", "01", "02", "03", "04", "05"])
-
-
-class Example(CommandTest):
-    def test_example_package(self):
-        shown = self.json("project", str(MEDIA / "Sketch.fuguex"))
-        self.assertEqual([item["name"] for item in shown["alternatives"]], ["Sketch", "Sketch, slower"])
-        self.assertEqual([item["name"] for item in shown["alternatives"][1]["backups"]], ["00"])
 
 
 if __name__ == "__main__":

@@ -43,13 +43,6 @@ class Scan(CommandTest):
         self.assertEqual([line.split("\t")[0] for line in self.lines("scan", "lib")], self.paths("lib"))
         self.failure("scan", "lib", "--csv", "--json", status=2)
 
-    def test_csv_quotes(self):
-        path = self.loop('lib/a, "b"\nc.aiff')
-        self.run_command("tags", "set", str(path), "descriptors=x,y", 'title=say "x"')
-        output = self.run_command("scan", "--csv", "lib").stdout.decode()
-        (row,) = csv.DictReader(io.StringIO(output, newline=""))
-        self.assertEqual((row["path"], row["descriptors"], row["title"]), ('lib/a, "b"\nc.aiff', "x,y", 'say "x"'))
-
     def test_bad_files_are_listed_at_the_end(self):
         self.loop("lib/good.aiff")
         for name, content in (("a.aiff", b""), ("b.CAF", b"no caf"), ("c.txt", b"no matter")):

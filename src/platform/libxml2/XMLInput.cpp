@@ -15,7 +15,7 @@ constexpr std::size_t kStart = 1024;
 /// The value of "encoding" in the XML declaration that `text` begins with; empty when there is none.
 std::string_view declaredEncoding(std::string_view text)
 {
-    if (!text.starts_with("<?xml"))
+    if (!text.starts_with("<?xml") || text.find_first_of(" \t\r\n") != 5) // "<?xml-stylesheet" is something else
         return {};
     text = text.substr(0, text.find("?>"));
     std::size_t at = text.find("encoding");

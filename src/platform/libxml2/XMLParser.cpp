@@ -4,11 +4,11 @@
 #include "platform/libxml2/XMLInput.h"
 
 #include <algorithm>
-#include <array>
 #include <exception>
 #include <forward_list>
 #include <new>
 #include <string>
+#include <utility>
 #include <vector>
 
 #include <libxml/parser.h>
@@ -23,6 +23,10 @@ namespace {
 constexpr std::size_t kLongestTag = 16 * 1024;
 // It looks for a prefix among all the namespaces in force.
 constexpr int kMostNamespaces = 256;
+// It keeps every name to the end, in a few thousand lists: a million different ones would take minutes.
+constexpr int kMostNames = 10'000;
+// It limits comments to so much, but not the white space around the root element, which stays in its buffer.
+constexpr std::size_t kLongestAroundRoot = 10'000'000;
 
 std::string_view viewOf(const xmlChar* text)
 {
@@ -53,6 +57,7 @@ public:
     XMLPosition position() const;
     XMLPosition elementPosition() const;
     libxml2::XMLInput& input() { return input_; }
+    void setMaximumDepth(int depth) { maximumDepth_ = depth; }
 
 private:
     static xmlSAXHandler handlers();
@@ -62,17 +67,23 @@ private:
     static void onCharacters(void* self, const xmlChar* text, int length);
     static void onError(void* self, xmlErrorPtr error);
     static int onRead(void* self, char* buffer, int length);
+    static void onProcessingInstruction(void* self, const xmlChar* target, const xmlChar* data);
     static void refuseDeclaration(void* self);
     static xmlEntityPtr refuseEntity(void* self, const xmlChar* name);
 
     template <class Event>
     void handle(Event event)
     {
-        sinceEvent_ = 0;
+        stretch_ = 0;
+        guard(event);
+    }
+    template <class Work>
+    void guard(Work work)
+    {
         if (stopped_)
             return;
         try {
-            event();
+            work();
         } catch (...) {
             thrown_ = std::current_exception();
             stop();
@@ -89,7 +100,10 @@ private:
     }
     void fail(std::int64_t code, std::string_view message);
     void stop();
-    bool isWithinTag() const;
+    std::string_view read(std::size_t most);
+    void refuseManyNames();
+    std::size_t longestStretch() const;
+    void refuseLongStretch();
 
     struct FreeContext {
         void operator()(xmlParserCtxtPtr context) const
@@ -104,9 +118,10 @@ private:
     XMLHandler& handler_;
     std::vector<XMLAttribute> attributes_;     // of the element that begins
     std::forward_list<std::string> keptNames_; // that had to be joined
-    int depth_ = 0;
-    std::array<int, kXMLMaximumDepth + 1> namespaces_{}; // in force at each depth
-    std::size_t sinceEvent_ = 0;                         // bytes read since the last event
+    int maximumDepth_ = kXMLMaximumDepth;
+    std::vector<int> namespaces_{0}; // in force at each depth, from that of no element on
+    std::size_t stretch_ = 0;        // bytes read since the last event
+    std::size_t longestStretch_ = 0; // how many there may be
     bool stopped_ = false;
     std::optional<Error> error_;
     std::exception_ptr thrown_;
@@ -121,10 +136,8 @@ xmlSAXHandler XMLParser::Implementation::handlers()
     sax.endElementNs = onEnd;
     // One function for both spares the parser the look for white space.
     sax.characters = sax.ignorableWhitespace = sax.cdataBlock = onCharacters;
-    sax.comment = [](void* self, const xmlChar*) { static_cast<Implementation*>(self)->sinceEvent_ = 0; };
-    sax.processingInstruction = [](void* self, const xmlChar*, const xmlChar*) {
-        static_cast<Implementation*>(self)->sinceEvent_ = 0;
-    };
+    sax.comment = [](void* self, const xmlChar*) { static_cast<Implementation*>(self)->stretch_ = 0; };
+    sax.processingInstruction = onProcessingInstruction;
     sax.getEntity = sax.getParameterEntity = refuseEntity;
     sax.entityDecl = [](void* s, const xmlChar*, int, const xmlChar*, const xmlChar*, xmlChar*) {
         refuseDeclaration(s);
@@ -158,13 +171,14 @@ void XMLParser::Implementation::start(const xmlChar* name, const xmlChar* prefix
     const xmlChar* behind = context_->input->cur;
     if (behind[0] != '>' && !(behind[0] == '/' && behind[1] == '>'))
         return;
-    if (depth_ == kXMLMaximumDepth)
+    if (namespaces_.size() > static_cast<std::size_t>(maximumDepth_))
         return fail(XML_ERR_INTERNAL_ERROR, "elements are nested too deeply");
-    ++depth_;
-    const auto depth = static_cast<std::size_t>(depth_);
-    namespaces_[depth] = namespaces_[depth - 1] + namespaces;
-    if (namespaces_[depth] > kMostNamespaces)
+    namespaces_.push_back(namespaces_.back() + namespaces);
+    if (namespaces_.back() > kMostNamespaces)
         return fail(XML_ERR_INTERNAL_ERROR, "too many namespaces are in force");
+    refuseManyNames();
+    if (stopped_)
+        return;
 
     attributes_.clear();
     keptNames_.clear();
@@ -182,7 +196,7 @@ void XMLParser::Implementation::onEnd(void* self, const xmlChar* name, const xml
 {
     auto& parser = *static_cast<Implementation*>(self);
     parser.handle([&] {
-        --parser.depth_;
+        parser.namespaces_.pop_back();
         parser.keptNames_.clear();
         parser.handler_.endElement(parser.written(prefix, name));
     });
@@ -223,28 +237,69 @@ xmlEntityPtr XMLParser::Implementation::refuseEntity(void* self, const xmlChar*)
     return nullptr;
 }
 
+void XMLParser::Implementation::onProcessingInstruction(void* self, const xmlChar*, const xmlChar*)
+{
+    auto& parser = *static_cast<Implementation*>(self);
+    parser.handle([&] { parser.refuseManyNames(); });
+}
+
 int XMLParser::Implementation::onRead(void* self, char* buffer, int length)
 {
     auto& parser = *static_cast<Implementation*>(self);
-    if (parser.sinceEvent_ > kLongestTag && parser.isWithinTag())
-        parser.handle([&] { parser.fail(XML_ERR_ATTRIBUTE_NOT_FINISHED, "a tag is too long"); });
-    // The document ends here for the parser, which may not be stopped by force while it holds pointers into its buffer.
-    if (parser.stopped_)
-        return 0;
     std::string_view text;
-    const std::size_t sinceEvent = parser.sinceEvent_;
-    parser.handle([&] { text = parser.input_.next(static_cast<std::size_t>(length)); });
+    parser.guard([&] { text = parser.read(static_cast<std::size_t>(length)); });
     std::copy(text.begin(), text.end(), buffer);
-    parser.sinceEvent_ = parser.isWithinTag() ? sinceEvent + text.size() : 0;
     return static_cast<int>(text.size());
 }
 
-/// Whether what is being parsed is a tag, when there was no event for long: text comes in small pieces, while comments,
-/// CDATA sections and the DOCTYPE, which come whole, have states of their own.
-bool XMLParser::Implementation::isWithinTag() const
+/// Nothing once it is stopped: the document ends there for the parser, which may not be stopped by force while it holds
+/// pointers into its buffer.
+std::string_view XMLParser::Implementation::read(std::size_t most)
 {
-    return context_ != nullptr &&
-           (context_->instate == XML_PARSER_CONTENT || context_->instate == XML_PARSER_ATTRIBUTE_VALUE);
+    refuseLongStretch();
+    if (stopped_)
+        return {};
+    const std::string_view text = input_.next(most);
+    stretch_ += text.size();
+    return text;
+}
+
+/// How much may be read without an event where the parser stands; 0: comments, CDATA sections and processing
+/// instructions come whole, and it limits them itself. Text comes in small pieces.
+std::size_t XMLParser::Implementation::longestStretch() const
+{
+    switch (context_->instate) {
+    case XML_PARSER_COMMENT:
+    case XML_PARSER_CDATA_SECTION:
+    case XML_PARSER_PI:
+        return 0;
+    case XML_PARSER_CONTENT:
+    case XML_PARSER_ATTRIBUTE_VALUE:
+        return kLongestTag;
+    default:
+        return kLongestAroundRoot;
+    }
+}
+
+void XMLParser::Implementation::refuseLongStretch()
+{
+    if (context_ == nullptr)
+        return;
+    const std::size_t longest = longestStretch();
+    if (longest != std::exchange(longestStretch_, longest))
+        stretch_ = 0;
+    if (longest == 0 || stretch_ <= longest)
+        return;
+    if (longest == kLongestTag)
+        fail(XML_ERR_ATTRIBUTE_NOT_FINISHED, "a tag is too long");
+    else
+        fail(XML_ERR_INTERNAL_ERROR, "there is too much around the root element");
+}
+
+void XMLParser::Implementation::refuseManyNames()
+{
+    if (xmlDictSize(context_->dict) > kMostNames)
+        fail(XML_ERR_INTERNAL_ERROR, "too many different names");
 }
 
 void XMLParser::Implementation::fail(std::int64_t code, std::string_view message)
@@ -279,7 +334,8 @@ bool XMLParser::Implementation::parse(Error* error)
         throw std::bad_alloc();
     // Pulled, not pushed: the push parser is quadratic on long CDATA sections. XML_PARSE_NOENT is for the predefined
     // entities, the only ones that there are: without it "&amp;" in an attribute would be handed over as "&#38;".
-    xmlCtxtUseOptions(context_.get(), XML_PARSE_NONET | XML_PARSE_IGNORE_ENC | XML_PARSE_NOENT);
+    const int huge = maximumDepth_ > kXMLMaximumDepth ? XML_PARSE_HUGE : 0;
+    xmlCtxtUseOptions(context_.get(), XML_PARSE_NONET | XML_PARSE_IGNORE_ENC | XML_PARSE_NOENT | huge);
     xmlParseDocument(context_.get());
     // What ended the input is the cause; that the document is cut off then follows.
     if (input_.failed() && !thrown_) {
@@ -355,6 +411,11 @@ bool XMLParser::parse(Error* error)
 void XMLParser::abort()
 {
     implementation_->abort();
+}
+
+void XMLParser::setMaximumDepth(int depth)
+{
+    implementation_->setMaximumDepth(depth);
 }
 
 XMLPosition XMLParser::position() const

@@ -21,8 +21,6 @@ public:
     /// The value, once the outermost element has ended.
     Value takeValue() { return std::move(result_); }
     const std::string& problem() const { return problem_; }
-    /// Makes the work fail for a reason that the caller knows; always false.
-    bool fail(std::string_view problem);
 
 private:
     enum class Element : std::uint8_t { none, plist, array, dict, key, string, data, date, yes, no, real, integer };
@@ -34,6 +32,7 @@ private:
         bool hasKey = false; // a key waits for its value
     };
 
+    bool fail(std::string_view problem); // always false
     static Element elementNamed(std::string_view name);
     bool mayStart(Element element, std::string_view name);
     bool endContainer();

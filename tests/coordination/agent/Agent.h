@@ -2,6 +2,7 @@
 #pragma once
 
 #include "platform/FileCoordination.h"
+#include "support/URLs.h"
 
 #include <functional>
 #include <map>
@@ -17,11 +18,10 @@ public:
 };
 
 void say(const std::string& line);
-platform::URLRef urlOf(const std::string& path);
 
 /// "read", "write": a coordinated access that ends with the command "leave".
 std::unique_ptr<Actor> makeAccess(const std::string& name, bool isWriting, const std::string& path);
-/// "presenterlock TYPE", "coordlock TYPE": take "retain", "release", "reset", "state".
+/// "presenterlock TYPE", "coordlock TYPE": take "retain", "release", "state".
 std::unique_ptr<Actor> makePresenterLock(const std::string& name, unsigned type, const std::string& path);
 std::unique_ptr<Actor> makeCoordinationLock(const std::string& name, unsigned type, const std::string& path);
 /// "present BEHAVIOUR": never, twice, drop, save or atonce; takes "answer" and "unregister".

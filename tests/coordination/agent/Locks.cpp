@@ -19,9 +19,6 @@ public:
         } else if (verb == "release") {
             say(name_ + " releases");
             lock_->releaseLock();
-        } else if (verb == "reset") {
-            say(name_ + " releases");
-            lock_->resetLock();
         } else {
             state();
         }

@@ -19,11 +19,6 @@ void say(const std::string& line)
         _exit(9);
 }
 
-platform::URLRef urlOf(const std::string& path)
-{
-    return platform::URL::createWithFileSystemPath(platform::String::fromUTF8(path), platform::PathStyle::posix, false);
-}
-
 namespace {
 
 /// Signals, and no restarting of what they interrupt, a thousand times a second; in the threads of accesses alone,

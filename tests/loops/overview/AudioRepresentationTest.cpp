@@ -1,35 +1,13 @@
 #include "loops/overview/AudioRepresentation.h"
 
 #include "OverviewImages.h"
-#include "platform/Log.h"
-#include "support/FaultInjection.h"
 #include "support/TemporaryFolder.h"
 
 #include <gtest/gtest.h>
 
-#include <cerrno>
-#include <filesystem>
-
 namespace {
 
 constexpr platform::SampleFormat kFloats{32, true, false, std::endian::little};
-
-TEST(AudioRepresentation, TakesItsPointsFromAnOverview)
-{
-    const KTMem block = blockOf(300, {{-127, 64}, {0, 127}});
-    const auto representation = AudioRepresentation::audioRepresentationWithOverview(&block, 48000.5);
-    ASSERT_NE(representation, nullptr);
-    EXPECT_EQ(representation->frames(), 300);
-    EXPECT_EQ(representation->channels(), 1);
-    EXPECT_EQ(representation->sampleRate(), 48000.5);
-    EXPECT_EQ(representation->overviewFrames(), 2u);
-    ASSERT_EQ(representation->overviewBuffers().size(), 2u);
-    for (const auto& buffers : representation->overviewBuffers()) {
-        EXPECT_EQ(buffers.minima, (std::vector<float>{-127.0F / 128, 0}));
-        EXPECT_EQ(buffers.maxima, (std::vector<float>{0.5F, 127.0F / 128}));
-    }
-    EXPECT_TRUE(representation->samples(0).empty());
-}
 
 TEST(AudioRepresentation, NothingComesOfWhatIsNoOverview)
 {
@@ -40,20 +18,6 @@ TEST(AudioRepresentation, NothingComesOfWhatIsNoOverview)
     SetOverviewFrames(negative, std::int64_t{1} << 31);
     for (const KTMem* block : std::initializer_list<const KTMem*>{nullptr, &none, &header, &pointMissing, &negative})
         EXPECT_EQ(AudioRepresentation::initWithOverview(block, 44100), nullptr);
-}
-
-TEST(AudioRepresentation, ABlockOfOtherLengthIsTakenAsFarAsItGoes)
-{
-    const KTMem block = blockOf(600, {{0, 1}, {0, 2}, {0, 3}});
-    const auto representation = AudioRepresentation::initWithOverview(&block, 44100);
-    representation->createOverviewFromOverviewData(blockOf(300, {{-64, 0}, {-32, 0}}));
-    EXPECT_EQ(representation->overviewBuffers()[0].minima, (std::vector<float>{-0.5F, -0.25F, 0}));
-    EXPECT_EQ(representation->overviewBuffers()[0].maxima, (std::vector<float>{0, 0, 0}));
-    for (const auto& [channels, buffers] : {std::pair{-1, 1u}, {0, 1u}, {1, 2u}, {2, 3u}, {3, 3u}, {1024, 3u}}) {
-        representation->prepareOverviewBuffersForNumChannels(channels);
-        ASSERT_EQ(representation->overviewBuffers().size(), buffers) << channels;
-        EXPECT_EQ(representation->overviewBuffers().back().maxima, std::vector<float>(3)) << channels;
-    }
 }
 
 TEST(AudioRepresentation, ReadsTheSamplesOfAFile)
@@ -85,30 +49,6 @@ TEST(AudioRepresentation, ReadsTheSamplesOfAFile)
     EXPECT_TRUE(std::ranges::equal(mono->samples(0), interleaved));
     EXPECT_EQ(mono->overviewBuffers().size(), 2u);
     EXPECT_EQ(mono->overviewBuffers()[0].minima, mono->overviewBuffers()[1].minima);
-}
-
-std::string logged;
-
-TEST(AudioRepresentation, LogsWhichStepFailed)
-{
-    const auto before = platform::setLogHandler([](const char* line) { logged += std::string(line) + '\n'; });
-    const TemporaryFolder folder;
-    const CFileRef file(folder.write("a.caf", imageOf(kFloats, 1, Bytes(40000))).c_str(), false);
-    const CFileRef text(folder.write("a.txt", "no audio").c_str(), false);
-    const CFileRef missing((folder / "missing.wav").c_str(), false);
-    const auto failureOf = [](const CFileRef& ref) {
-        logged.clear();
-        EXPECT_EQ(AudioRepresentation::newAudioRepresentationUsingCAudioFileIOWithFileURL(ref.URL()), nullptr);
-        return logged;
-    };
-    EXPECT_EQ(failureOf(missing), "AudioRepresentation Open: -43\n");
-    EXPECT_EQ(failureOf(text), "AudioRepresentation Read: -50\n");
-    FaultInjector faults;
-    faults.fail(Call::pread, EIO, 2);
-    EXPECT_TRUE(failureOf(file).ends_with("\nAudioRepresentation Read: -36\n")) << logged;
-    faults.fail(Call::close, EIO);
-    EXPECT_EQ(failureOf(file), "AudioRepresentation Close: -36\n");
-    platform::setLogHandler(before);
 }
 
 } // namespace

@@ -57,34 +57,14 @@ TEST(MDOverview, KnownPicturesOfKnownSignals)
         {"always above zero", Samples(256, 50), 1, {{0, 50}}},
         {"click, first of a point", click(256), 1, {{0, 0}, {0, 100}}},
         {"click, last of a point", click(255), 1, {{0, 100}, {0, 0}}},
-        {"click at the end", click(511), 1, {{0, 0}, {0, 100}}},
         {"full-scale negative", Samples(300, -128), 1, {{-127, 0}, {-127, 0}}},
         {"left only", alternating(4, 60, 0), 2, {{0, 60}}},
-        {"left only, negative", alternating(4, -60, 0), 2, {{0, 60}}},
         {"right only, full scale", alternating(600, 0, -128), 2, {{-127, 0}, {-127, 0}}},
         {"left full-scale negative", alternating(2, -128, 1), 2, {{-1, 127}}},
         {"three channels are folded", {1, -2, 30, 4, -50, 6}, 3, {{-50, 30}}},
     };
     for (const auto& [name, samples, channels, points] : cases)
         EXPECT_EQ(pointsOfBytes(samples, channels), points) << name;
-}
-
-TEST(MDOverview, TheBlockIsAsLongAsItsFramesNeed)
-{
-    const struct {
-        long frames;
-        const char* hex;
-    } cases[] = {{1, "01000000000000000001"}, {256, "00010000000000000001"}, {257, "010100000000000000010001"}};
-    const Samples samples(257, 1);
-    for (const auto& [frames, hex] : cases) {
-        KTMem block(100);
-        MDOverview overview(&block);
-        overview.Add(samples.data(), 0, frames, 1, 1, 1);
-        EXPECT_EQ(overview.Finalize(), &block);
-        EXPECT_EQ(toHex(bytesOf(block)), hex);
-        EXPECT_TRUE(IsOverviewBlock(block));
-        EXPECT_EQ(overview.Finalize(), nullptr);
-    }
 }
 
 TEST(MDOverview, TakesTheFirstOrTheLastByteOfAStride)
@@ -96,25 +76,6 @@ TEST(MDOverview, TakesTheFirstOrTheLastByteOfAStride)
         overview.Add(samples.data(), 0, 2, 1, 3, firstByte);
         EXPECT_EQ(pointsOf(block), (Points{{0, maximum}})) << firstByte;
     }
-}
-
-TEST(MDOverview, AnotherStartBeginsAPointAnew)
-{
-    const Samples loud(300, 100);
-    const Samples quiet(300, 5);
-    KTMem block(OverviewBlockSize(600));
-    MDOverview overview(&block);
-    overview.Add(loud.data(), 0, 300, 1, 1, 0);
-    EXPECT_EQ(OverviewFrames(block), 256u); // of the completed points
-    overview.Add(quiet.data(), 300, 10, 1, 1, 0);
-    EXPECT_EQ(pointsOf(block), (Points{{0, 100}, {0, 100}, {0, 0}})); // goes on
-    overview.Add(quiet.data(), 290, 10, 1, 1, 0);
-    EXPECT_EQ(pointsOf(block), (Points{{0, 100}, {0, 5}, {0, 0}})); // what was there is gone
-    overview.Add(loud.data(), 511, 2, 1, 1, 0);
-    EXPECT_EQ(pointsOf(block), (Points{{0, 100}, {0, 100}, {0, 100}}));
-    EXPECT_EQ(OverviewFrames(block), 512u);
-    overview.Finalize();
-    EXPECT_EQ(OverviewFrames(block), 513u);
 }
 
 TEST(MDOverview, WhatIsBeyondTheBlockIsDropped)
@@ -140,31 +101,6 @@ TEST(MDOverview, WhatIsBeyondTheBlockIsDropped)
     EXPECT_EQ(OverviewFrames(block), 2048u);
 }
 
-TEST(MDOverview, WithoutABlockNothingHappens)
-{
-    const float sample = 1;
-    const std::int8_t byte = 1;
-    KTMem none;
-    KTMem tooSmall(7);
-    for (KTMem* block : std::initializer_list<KTMem*>{nullptr, &none, &tooSmall}) {
-        MDOverview overview(block);
-        overview.Add(&sample, 0, 1, 1);
-        overview.Add(&byte, 0, 1, 1, 1, 0);
-        overview.AddRough(&sample, 1);
-        EXPECT_EQ(overview.Finalize(), block);
-    }
-    KTMem block(10);
-    MDOverview overview(&block);
-    const std::vector<float> samples(4096, 1.0F);
-    overview.Add(samples.data(), 0, 1, 2049);
-    overview.Add(samples.data(), 0, 1, 0);
-    overview.AddStored(samples.data(), {12, false, false, std::endian::little}, 0, 1, 1);
-    overview.Add(&byte, 0, 1, 1, 0, 0);
-    EXPECT_EQ(toHex(bytesOf(block)), "00000000000000000000");
-    overview.Add(samples.data(), 0, 1, 2048);
-    EXPECT_EQ(pointsOf(block), (Points{{0, 127}}));
-}
-
 TEST(MDOverview, RoundsHalfToEvenClampsAndPassesOverNaN)
 {
     constexpr float infinity = std::numeric_limits<float>::infinity();
@@ -181,44 +117,6 @@ TEST(MDOverview, RoundsHalfToEvenClampsAndPassesOverNaN)
         overview.Add(&sample, 0, 1, 1);
         EXPECT_EQ(pointsOf(block), (Points{{std::min(value, 0), std::max(value, 0)}})) << sample;
     }
-}
-
-// Every 8-bit value keeps its own.
-TEST(MDOverview, EightBitAudioKeepsItsValues)
-{
-    for (int value = -127; value <= 127; ++value) {
-        KTMem block(10);
-        MDOverview overview(&block);
-        const auto stored = static_cast<unsigned char>(value + 128);
-        overview.AddStored(&stored, {8, false, true, std::endian::little}, 0, 1, 1);
-        EXPECT_EQ(pointsOf(block), (Points{{std::min(value, 0), std::max(value, 0)}}));
-    }
-}
-
-TEST(MDOverview, AnySlicesGiveWhatThePlainRoadGives)
-{
-    std::mt19937 random(1);
-    const platform::SampleFormat floatFormat{32, true, false, std::endian::native};
-    for (const int channels : {1, 2, 3, 5, 6, 8, 24, 100, 700, 1024, 2048})
-        for (int round = 0; round < 6; ++round) {
-            const auto frames = static_cast<long>(1 + random() % (channels > 24 ? 600 : 6000));
-            const Bytes stored = randomSamples(random, floatFormat,
-                                               static_cast<std::size_t>(frames) * static_cast<std::size_t>(channels));
-            const auto* samples = reinterpret_cast<const float*>(stored.data());
-            KTMem plain(OverviewBlockSize(frames));
-            MDOverview reference(&plain);
-            KTMem block(OverviewBlockSize(frames));
-            MDOverview overview(&block);
-            for (long done = 0; done < frames;) {
-                const auto count = std::min<long>(frames - done, static_cast<long>(random() % 900));
-                addPlainly(reference, samples + done * channels, done, count, channels);
-                overview.Add(samples + done * channels, done, count, channels);
-                ASSERT_EQ(bytesOf(block), bytesOf(plain)) << channels << " channels, " << done << " + " << count;
-                done += count;
-            }
-            const Bytes sliced = bytesOf(*overview.Finalize());
-            EXPECT_EQ(sliced, plainOverview(floatFormat, channels, stored)) << channels;
-        }
 }
 
 TEST(MDOverview, TheRoughPictureFollowsTheExactOneAndDecays)
@@ -249,19 +147,6 @@ TEST(MDOverview, TheRoughPictureFollowsTheExactOneAndDecays)
     overview.Add(loud.data(), 100, 256 * 9, 1); // the exact pass takes its points back
     EXPECT_EQ(pointsOf(block)[1], (std::pair{0, 127}));
     EXPECT_EQ(pointsOf(block)[8], (std::pair{0, 127}));
-}
-
-TEST(MDOverview, TheRoughPictureStopsWhereTheExactOneHasPassed)
-{
-    KTMem block(OverviewBlockSize(1024));
-    MDOverview overview(&block);
-    const std::vector<float> silence(600);
-    const std::vector<float> loud(600, 1.0F);
-    overview.Add(silence.data(), 0, 10, 1);
-    overview.AddRough(loud.data(), 10); // up to frame 20
-    overview.Add(silence.data(), 0, 600, 1);
-    overview.AddRough(loud.data(), 300); // from frame 20 on: passed
-    EXPECT_EQ(pointsOf(block), (Points{{0, 0}, {0, 0}, {0, 0}, {0, 0}}));
 }
 
 } // namespace

@@ -82,27 +82,16 @@ inline Bytes randomSamples(std::mt19937& random, platform::SampleFormat format, 
 /// The body of a WAVE "fmt " chunk; floats with their own tag.
 inline Bytes waveFormat(platform::SampleFormat format, int channels)
 {
-    const int frame = channels * format.bytesPerSample();
-    ByteWriter out(std::endian::little);
-    out.write(static_cast<std::uint16_t>(format.isFloat ? 3 : 1));
-    out.write(static_cast<std::uint16_t>(channels));
-    out.write(std::uint32_t{44100});
-    out.write(static_cast<std::uint32_t>(44100 * frame));
-    out.write(static_cast<std::uint16_t>(frame));
-    out.write(static_cast<std::uint16_t>(format.bits));
-    return out.take();
+    return waveFormat(format.isFloat ? 3 : 1, channels, 44100, channels * format.bytesPerSample(), format.bits);
 }
 
-/// The body of a CAF "desc" chunk.
 inline Bytes cafDescription(platform::SampleFormat format, int channels)
 {
-    ByteWriter out;
-    out.write(44100.0);
-    out.write(bytesOf("lpcm"));
-    out.write(static_cast<std::uint32_t>((format.isFloat ? 1 : 0) | (format.order == std::endian::little ? 2 : 0)));
-    for (const int field : {channels * format.bytesPerSample(), 1, channels, format.bits})
-        out.write(static_cast<std::uint32_t>(field));
-    return out.take();
+    const auto number = [](int value) { return static_cast<std::uint32_t>(value); };
+    const int flags = (format.isFloat ? 1 : 0) | (format.order == std::endian::little ? 2 : 0);
+    return cafDescription(
+        44100, "lpcm",
+        {number(flags), number(channels * format.bytesPerSample()), 1, number(channels), number(format.bits)});
 }
 
 /// A file of the samples: WAVE for 8 unsigned bits, else CAF.

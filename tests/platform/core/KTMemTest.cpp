@@ -6,9 +6,6 @@
 #include <cstring>
 #include <limits>
 #include <new>
-#include <set>
-#include <utility>
-#include <vector>
 
 // Under a sanitizer an allocation that is too large must fail as it does without.
 extern "C" const char* __asan_default_options();
@@ -62,32 +59,6 @@ TEST(KTMem, WhenMemoryIsShortTheBlockIsUnchanged)
     ASSERT_EQ(block.size(), 3U);
     EXPECT_EQ(block.data()[2], std::byte{7});
     EXPECT_THROW(KTMem{kTooMuch}, std::bad_alloc);
-}
-
-TEST(KTMem, AppendingInSmallStepsMovesTheBlockRarely)
-{
-    // Blocks that the allocator extends in place do not count, so a neighbour is allocated after each move.
-    KTMem block;
-    std::set<const std::byte*> places;
-    std::vector<KTMem> neighbours;
-    for (std::size_t size = 1; size <= 60'000; ++size) {
-        ASSERT_TRUE(block.reallocate(size));
-        if (places.insert(block.data()).second)
-            neighbours.emplace_back(64);
-    }
-    EXPECT_LT(places.size(), 40U);
-}
-
-TEST(KTMem, MovingHandsOverTheBytes)
-{
-    KTMem from(5);
-    const std::byte* bytes = from.data();
-    KTMem to(std::move(from));
-    EXPECT_EQ(to.data(), bytes);
-    KTMem assigned(2);
-    assigned = std::move(to);
-    EXPECT_EQ(assigned.data(), bytes);
-    EXPECT_EQ(assigned.size(), 5U);
 }
 
 } // namespace

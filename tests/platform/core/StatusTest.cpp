@@ -47,13 +47,4 @@ TEST(Status, AnApplicationErrorStandsForTheOneBelowIt)
     EXPECT_EQ(NSErrorToOSErr(error("elsewhere", 5, status).get()), -1);
 }
 
-TEST(Status, EveryStatusHasATextOfItsOwn)
-{
-    EXPECT_STREQ(StatusText(kStatusDiskFull), "disk full");
-    EXPECT_STREQ(StatusText(-4711), "unknown error");
-    for (const std::int32_t status : {0,   -27, -34, -36, -37,  -38,   -39,   -40,   -41,   -42,   -43,   -47,
-                                      -48, -50, -51, -61, -128, -1302, -1303, -1309, -1407, -1425, -5000, -5023})
-        EXPECT_STRNE(StatusText(status), "unknown error") << status;
-}
-
 } // namespace

@@ -1,0 +1,16 @@
+// Files of a test by their paths, as references and as URLs.
+#pragma once
+
+#include "files/CFileRef.h"
+
+#include <string>
+
+inline CFileRef file(const std::string& path)
+{
+    return CFileRef(path.c_str(), false);
+}
+
+inline CFileRef directory(const std::string& path)
+{
+    return CFileRef(path.c_str(), true);
+}

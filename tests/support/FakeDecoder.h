@@ -15,27 +15,48 @@ public:
         FourCC formatId = fourCC(".mp3");
         FourCC fileType = fourCC("MPG3");
         std::uint64_t frames = 1000;
-        std::optional<std::int64_t> validFrames; // of the packet table
+        std::uint64_t framesThere = ~std::uint64_t{0};          // where the file ends ahead of them
+        std::optional<std::int64_t> validFrames = std::nullopt; // of the packet table
         bool hasFile = true;
         int seeks = 0;                            // done so far
         int failingSeek = 0;                      // the number of the one that fails
         std::uint64_t broken = ~std::uint64_t{0}; // a frame that cannot be read
     };
 
-    /// While it lives, files that are no linear PCM are opened as `file`.
+    /// While it lives, files that are no linear PCM are opened as `file`; rates are converted by the true module.
     class Module {
     public:
         explicit Module(File& file)
         {
             opened = &file;
-            platform::decoderOpener() = [](const char*, std::int32_t*) -> platform::AudioDecoder* {
-                return new FakeDecoder(*opened);
-            };
+            platform::replaceDecoderModule(&module);
         }
-        ~Module() { platform::decoderOpener() = nullptr; }
+        ~Module() { platform::replaceDecoderModule(nullptr); }
 
     private:
+        static platform::AudioDecoder* open(const char*, std::int32_t*) { return new FakeDecoder(*opened); }
+        static platform::Resampler* makeResampler(std::uint32_t channels, std::uint32_t from, std::uint32_t to,
+                                                  std::int32_t* status)
+        {
+            platform::replaceDecoderModule(nullptr);
+            const platform::DecoderModule* loaded = platform::decoderModule();
+            platform::replaceDecoderModule(&module);
+            return loaded != nullptr ? loaded->makeResampler(channels, from, to, status) : nullptr;
+        }
+
         static inline File* opened;
+        static inline const platform::DecoderModule module{platform::DecoderModule::currentVersion, nullptr, open,
+                                                           makeResampler};
+    };
+
+    /// While it lives, there is no module.
+    class NoModule {
+    public:
+        NoModule() { platform::replaceDecoderModule(&none); }
+        ~NoModule() { platform::replaceDecoderModule(nullptr); }
+
+    private:
+        static inline const platform::DecoderModule none{};
     };
 
     explicit FakeDecoder(File& file) : file_(file), handle_(file.fileType)
@@ -63,8 +84,9 @@ public:
     }
     std::int32_t read(std::uint32_t& frames, void* to) override
     {
+        const std::uint64_t framesThere = std::min(file_.frames, file_.framesThere);
         frames = static_cast<std::uint32_t>(
-            std::min<std::uint64_t>({frames, 7, file_.frames - std::min(frame_, file_.frames)}));
+            std::min<std::uint64_t>({frames, 7, framesThere - std::min(frame_, framesThere)}));
         for (std::uint32_t i = 0; i < frames; ++i, ++frame_) {
             if (frame_ == file_.broken)
                 return kStatusIOError;

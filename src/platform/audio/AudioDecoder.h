@@ -22,6 +22,9 @@ public:
     /// What read() gives: interleaved, packed linear PCM of a supported sample, at the file's rate and channel count.
     virtual const StreamDescription& frameFormat() const = 0;
     virtual std::uint64_t frameCount() const = 0;
+    /// Which speakers the channels feed, as bits of WAVE's channel mask (KSAUDIO_SPEAKER), channels in their order; 0
+    /// when the file does not say.
+    virtual std::uint32_t speakers() const { return 0; }
     /// False when the format has none.
     virtual bool packetTable(PacketTable&) const { return false; }
     /// The file itself, which stays the decoder's: answers "ffmt" with its type code. Null when there is none.

@@ -6,3 +6,7 @@ pkg_check_modules(libxml2 REQUIRED IMPORTED_TARGET libxml-2.0)
 pkg_check_modules(libmd REQUIRED IMPORTED_TARGET libmd)
 find_package(ZLIB REQUIRED)
 find_package(Threads REQUIRED)
+
+# Decoders of compressed audio, in a module of their own; without these packages the library has none.
+pkg_check_modules(ffmpeg IMPORTED_TARGET libavformat libavcodec libswresample libavutil)
+option(KTFILES_WITH_FFMPEG "Build the decoder module" ${ffmpeg_FOUND})

@@ -1,10 +1,15 @@
 # What `make install` puts where: the library, its headers by room, the CMake package, the pkg-config file, the command.
-# Three components, which are also the three packages: runtime, development, command.
+# Components, which are also the packages: runtime, development, command, and decoders where the module is built.
 
 include(CMakePackageConfigHelpers)
 
 install(TARGETS KTFiles EXPORT KTFilesTargets
     LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR} COMPONENT runtime NAMELINK_COMPONENT development)
+
+# Beside the library, where it looks for the module.
+if(TARGET ktfiles_decoders)
+    install(TARGETS ktfiles_decoders LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR}/ktfiles COMPONENT decoders)
+endif()
 
 # The headers of implementations (platform/posix/ and the like) are nobody's business.
 foreach(room platform/core platform files loops/tagging audiofile files/registry loops loops/overview adm coordination

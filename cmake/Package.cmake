@@ -1,4 +1,4 @@
-# `cpack -G DEB`: libktfiles0, libktfiles-dev and ktfiles.
+# `cpack -G DEB`: libktfiles0, libktfiles-dev, ktfiles, and libktfiles-ffmpeg where the decoder module is built.
 
 set(CPACK_PACKAGE_NAME ktfiles)
 set(CPACK_PACKAGE_VENDOR "KTFiles")
@@ -18,6 +18,15 @@ set(CPACK_DEBIAN_RUNTIME_PACKAGE_NAME libktfiles${PROJECT_VERSION_MAJOR})
 set(CPACK_DEBIAN_RUNTIME_PACKAGE_SECTION libs)
 set(CPACK_DEBIAN_RUNTIME_PACKAGE_CONTROL_EXTRA ${PROJECT_SOURCE_DIR}/cmake/triggers)
 set(CPACK_COMPONENT_RUNTIME_DESCRIPTION "The shared library")
+
+if(TARGET ktfiles_decoders)
+    list(APPEND CPACK_COMPONENTS_ALL decoders)
+    set(CPACK_DEBIAN_RUNTIME_PACKAGE_RECOMMENDS libktfiles-ffmpeg)
+    set(CPACK_DEBIAN_DECODERS_PACKAGE_NAME libktfiles-ffmpeg)
+    set(CPACK_DEBIAN_DECODERS_PACKAGE_SECTION libs)
+    set(CPACK_DEBIAN_DECODERS_PACKAGE_DEPENDS "libktfiles${PROJECT_VERSION_MAJOR} (= ${PROJECT_VERSION})")
+    set(CPACK_COMPONENT_DECODERS_DESCRIPTION "Decoders of compressed audio for the shared library")
+endif()
 
 set(CPACK_DEBIAN_DEVELOPMENT_PACKAGE_NAME libktfiles-dev)
 set(CPACK_DEBIAN_DEVELOPMENT_PACKAGE_SECTION libdevel)

@@ -1,0 +1,36 @@
+// What FFmpeg allocates, owned.
+#pragma once
+
+#include <memory>
+
+struct AVCodecContext;
+struct AVCodecParameters;
+struct AVFormatContext;
+struct AVFrame;
+struct AVPacket;
+
+namespace platform::ffmpeg {
+
+struct Release {
+    void operator()(AVCodecContext* context) const;
+    void operator()(AVCodecParameters* parameters) const;
+    void operator()(AVFormatContext* context) const;
+    void operator()(AVFrame* frame) const;
+    void operator()(AVPacket* packet) const;
+};
+
+using CodecContext = std::unique_ptr<AVCodecContext, Release>;
+using CodecParameters = std::unique_ptr<AVCodecParameters, Release>;
+using FormatContext = std::unique_ptr<AVFormatContext, Release>;
+using Frame = std::unique_ptr<AVFrame, Release>;
+using Packet = std::unique_ptr<AVPacket, Release>;
+
+// These throw std::bad_alloc.
+CodecParameters makeCodecParameters();
+Frame makeFrame();
+Packet makePacket();
+
+/// Keeps messages off standard error, as far as the process has set no level of its own; the first call does it.
+void quietLog();
+
+} // namespace platform::ffmpeg

@@ -85,4 +85,27 @@ void BM_ReadBlocksOfStream(benchmark::State& state)
 }
 BENCHMARK(BM_ReadBlocksOfStream)->ArgName("kind")->DenseRange(0, 3)->Unit(benchmark::kMillisecond);
 
+void BM_ReadBlocksAtAnotherRate(benchmark::State& state)
+{
+    const SoundOfAMinute sound(kinds[0]);
+    const auto rate = static_cast<double>(state.range(0));
+    const XStreamDescription client{rate, fourCC("lpcm"), 9, 8, 1, 8, kChannels, 32, 0};
+    XStreamRef stream = nullptr;
+    if (XStreamOpenWithFileRef(sound.reference(), 0, 0, 0, &client, nullptr, &stream) != 0)
+        state.SkipWithError("XStreamOpen failed");
+    std::vector<float> block(kBlock * kChannels);
+    for (auto _ : state)
+        for (std::int64_t frame = 0; frame + kBlock <= static_cast<std::int64_t>(rate * 60); frame += kBlock)
+            if (XStreamReadFramesSync(stream, frame, kBlock, nullptr, block.data(), nullptr) != 0)
+                state.SkipWithError("XStreamReadFramesSync failed");
+    XStreamClose(stream);
+    state.SetItemsProcessed(state.iterations() * kFrames);
+}
+BENCHMARK(BM_ReadBlocksAtAnotherRate)
+    ->ArgName("rate")
+    ->Arg(48000)
+    ->Arg(44099)
+    ->Arg(22050)
+    ->Unit(benchmark::kMillisecond);
+
 } // namespace

@@ -50,7 +50,8 @@ struct ChannelLayout {
 static_assert(sizeof(ChannelLayout) == 32);
 
 /// A file open for reading, with a place in it, a frame. Owns the file. Operations return 0 or a negative status; one
-/// that fails leaves the place where it was. Reading allocates nothing.
+/// that fails leaves the place where it was. Reading allocates nothing, except that a rate conversion may behind a
+/// seek. What is read at a place does not depend on how it was come to.
 class KT_EXPORT ConvertingReader final : public AudioHandle {
 public:
     static constexpr std::int32_t kPropertyNotSupported = -66561;
@@ -59,7 +60,7 @@ public:
     static constexpr FourCC fileFormatProperty = fourCC("ffmt");   // StreamDescription
     static constexpr FourCC clientFormatProperty = fourCC("cfmt"); // StreamDescription; can be set
     static constexpr FourCC clientLayoutProperty = fourCC("cclo"); // ChannelLayout, of any length; can be set
-    static constexpr FourCC frameCountProperty = fourCC("#frm");   // 64-bit
+    static constexpr FourCC frameCountProperty = fourCC("#frm");   // 64-bit, at the file's rate
     static constexpr FourCC audioFileProperty = fourCC("afil");   // AudioHandle*, the reader's; null when there is none
     static constexpr FourCC packetTableProperty = fourCC("xpti"); // PacketTable; not of linear PCM
 
@@ -72,13 +73,23 @@ public:
     const StreamDescription& fileFormat() const;
     /// What read() gives. At first linear PCM as near to the file's own as it can be.
     const StreamDescription& clientFormat() const;
-    /// Interleaved, packed linear PCM of any supported sample and channel count, at the file's sample rate; else
-    /// kFormatNotSupported. Samples of another kind go by way of 32-bit floats. Other channel counts: one channel goes
-    /// to all, all are averaged to one, else surplus channels are left out and missing ones silent. Drops the layout.
-    std::int32_t setClientFormat(const StreamDescription& format);
+    /// Interleaved, packed linear PCM of any supported sample and channel count; else kFormatNotSupported, and `error`
+    /// (may be null) says what to install where that would help. Samples of another kind go by way of 32-bit floats.
+    /// Other channel counts: one channel goes to all, all are averaged to one, else surplus channels are left out and
+    /// missing ones silent. Drops the layout.
+    ///
+    /// Another sample rate needs the decoder module, and on both sides 1 to 768,000 whole hertz and at most 64 channels.
+    /// Places and counts of frames are then those of the client's rate. A rate other than before sets the place to 0.
+    std::int32_t setClientFormat(const StreamDescription& format, Error* error = nullptr);
+    /// Which speakers the file's channels feed, as bits of WAVE's channel mask (KSAUDIO_SPEAKER), channels in their
+    /// order. 0 when it does not say, and of linear PCM that the library reads itself (CAudioFileIO tells).
+    std::uint32_t speakers() const;
+    /// The file's frames, at its own rate.
     std::uint64_t frameCount() const;
+    /// The frames that there are to read: at the client's rate those whose time is ahead of the file's end.
+    std::uint64_t clientFrameCount() const;
 
-    /// kStatusBeforeStart below 0; a place past the end is one where nothing is read.
+    /// At the client's rate. kStatusBeforeStart below 0; a place past the end is one where nothing is read.
     std::int32_t seek(std::int64_t frame);
     /// Reads into one buffer of all channels, and sets `frames` to how many were read: fewer than asked only at the end
     /// of the file or of the buffer's room, and none at the end. On failure none.

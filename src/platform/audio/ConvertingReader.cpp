@@ -4,6 +4,7 @@
 #include "platform/audio/DecoderModule.h"
 #include "platform/audio/FrameConverter.h"
 #include "platform/audio/LinearPCMDecoder.h"
+#include "platform/audio/ResamplingDecoder.h"
 #include "platform/core/Status.h"
 
 #include <algorithm>
@@ -17,12 +18,13 @@ namespace platform {
 
 struct ConvertingReader::Implementation {
     std::unique_ptr<AudioDecoder> decoder;
+    std::unique_ptr<ResamplingDecoder> resampling; // over it, where the client's rate is another
     StreamDescription client;
     Bytes layout; // of the client's channels; empty when none was set
     FrameConverter converter;
     Bytes piece; // what the decoder gave and the converter takes
     std::uint64_t frame = 0;
-    bool isLost = false; // the decoder is not at `frame`
+    bool isLost = false; // the source is not at `frame`
 
     explicit Implementation(std::unique_ptr<AudioDecoder> opened)
         : decoder(std::move(opened)),
@@ -30,6 +32,7 @@ struct ConvertingReader::Implementation {
     {
     }
 
+    AudioDecoder& source() const { return resampling ? *resampling : *decoder; }
     std::int32_t readFrames(std::byte* to, std::uint32_t wanted, std::uint32_t& done);
 };
 
@@ -56,6 +59,22 @@ std::unique_ptr<AudioDecoder> openLinearPCM(const URL& url, std::int32_t& status
     if (status == kStatusOK && !LinearPCMDecoder::canDecode(format))
         status = AudioHandle::kFormatNotSupported;
     return status == kStatusOK ? std::make_unique<LinearPCMDecoder>(std::move(file), format, frames) : nullptr;
+}
+
+/// Where the client's rate is another than the decoder's; null, with status 0, where it is not. Converts the channels
+/// of the file or those of the client, whichever are fewer.
+std::unique_ptr<ResamplingDecoder> makeResampling(AudioDecoder& decoder, const StreamDescription& client,
+                                                  std::int32_t& status, Error* error)
+{
+    const StreamDescription& frames = decoder.frameFormat();
+    if (client.sampleRate == frames.sampleRate)
+        return nullptr;
+    const std::uint32_t channels = std::min(frames.channelsPerFrame, client.channelsPerFrame);
+    std::unique_ptr<Resampler> resampler = makeResampler(channels, frames.sampleRate, client.sampleRate, status, error);
+    if (!resampler)
+        return nullptr;
+    return std::make_unique<ResamplingDecoder>(decoder, std::move(resampler), channels,
+                                               static_cast<std::uint32_t>(client.sampleRate));
 }
 
 } // namespace
@@ -92,22 +111,43 @@ const StreamDescription& ConvertingReader::clientFormat() const
     return implementation_->client;
 }
 
+std::uint32_t ConvertingReader::speakers() const
+{
+    return implementation_->decoder->speakers();
+}
+
 std::uint64_t ConvertingReader::frameCount() const
 {
     return implementation_->decoder->frameCount();
 }
 
-std::int32_t ConvertingReader::setClientFormat(const StreamDescription& format)
+std::uint64_t ConvertingReader::clientFrameCount() const
 {
-    const StreamDescription& frames = implementation_->decoder->frameFormat();
-    if (!isPackedPCM(format) || format.sampleRate != frames.sampleRate)
+    return implementation_->source().frameCount();
+}
+
+std::int32_t ConvertingReader::setClientFormat(const StreamDescription& format, Error* error)
+{
+    Implementation& self = *implementation_;
+    if (!isPackedPCM(format)) {
+        fail(error, ErrorDomain::status, kFormatNotSupported, "frames can be read as packed linear PCM only");
         return kFormatNotSupported;
+    }
+    std::int32_t status = kStatusOK;
+    std::unique_ptr<ResamplingDecoder> resampling = makeResampling(*self.decoder, format, status, error);
+    if (status != kStatusOK)
+        return status;
+    const StreamDescription& frames = (resampling ? *resampling : *self.decoder).frameFormat();
     FrameConverter converter(frames, format);
     Bytes piece(converter.isCopy() ? 0 : converter.piece() * frames.bytesPerFrame);
-    implementation_->converter = std::move(converter);
-    implementation_->piece = std::move(piece);
-    implementation_->client = format;
-    implementation_->layout.clear();
+    self.isLost = self.isLost || resampling || self.resampling;
+    if (self.client.sampleRate != format.sampleRate)
+        self.frame = 0;
+    self.resampling = std::move(resampling);
+    self.converter = std::move(converter);
+    self.piece = std::move(piece);
+    self.client = format;
+    self.layout.clear();
     return kStatusOK;
 }
 
@@ -138,7 +178,7 @@ std::int32_t ConvertingReader::seek(std::int64_t frame)
     const auto target = static_cast<std::uint64_t>(frame);
     if (target == implementation_->frame && !implementation_->isLost)
         return kStatusOK;
-    const std::int32_t status = implementation_->decoder->seek(target);
+    const std::int32_t status = implementation_->source().seek(target);
     implementation_->isLost = status != kStatusOK;
     if (status == kStatusOK)
         implementation_->frame = target;
@@ -153,7 +193,7 @@ std::int32_t ConvertingReader::Implementation::readFrames(std::byte* to, std::ui
     while (done < wanted) {
         std::byte* const target = to + std::size_t{done} * client.bytesPerFrame;
         std::uint32_t got = std::min(most, wanted - done);
-        const std::int32_t status = decoder->read(got, converter.isCopy() ? target : piece.data());
+        const std::int32_t status = source().read(got, converter.isCopy() ? target : piece.data());
         if (status != kStatusOK || got == 0)
             return status;
         if (!converter.isCopy())
@@ -174,7 +214,7 @@ std::int32_t ConvertingReader::read(std::uint32_t& frames, std::span<AudioBuffer
         return kStatusParameterError;
     std::int32_t status = kStatusOK;
     if (self.isLost)
-        status = self.decoder->seek(self.frame);
+        status = self.source().seek(self.frame);
     self.isLost = status != kStatusOK;
     std::uint32_t done = 0;
     if (status == kStatusOK)

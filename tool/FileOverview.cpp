@@ -17,8 +17,8 @@ constexpr double kLowestRate = 0.001, kHighestRate = 1e9; // of what has a place
 
 void requireSound(const AudioFileInfo& info)
 {
-    if (!info.IsLinearPCM())
-        throw Failure("holds compressed sound; overviews are made of linear PCM only");
+    if (!info.compressed && !info.IsLinearPCM())
+        throw Failure("holds samples of a kind that is not read");
     if (info.channels > MDOverview::kMostChannels)
         throw Failure(
             fmt::format("has {} channels; an overview folds {} at most", info.channels, MDOverview::kMostChannels));
@@ -32,7 +32,8 @@ FileOverview FileOverview::computed(const std::string& path, bool quiet)
 {
     FileOverview overview;
     CAudioFileIO file;
-    openContainer(file, path, 0);
+    openAudio(file, path);
+    requireDecoder(file);
     overview.info_ = file.Info();
     requireSound(overview.info_);
     if (overview.info_.missingDataSize > 0 && !quiet)

@@ -10,6 +10,8 @@
 
 #include <nlohmann/json.hpp>
 
+#include <algorithm>
+
 namespace {
 
 AudioFileInfo describe(const std::string& path, bool quiet)
@@ -21,6 +23,11 @@ AudioFileInfo describe(const std::string& path, bool quiet)
     const std::int32_t status = GetAudioFileInfo(file, 0, info);
     if (file.GetEOF() == 0)
         throw Failure("is empty");
+    if (status == platform::AudioHandle::kFormatNotSupported) {
+        CAudioFileIO audio;
+        openAudio(audio, path);
+        requireDecoder(audio); // knows why
+    }
     if (status == kStatusEndOfFile)
         throw Failure("ends within its header");
     if (status == kStatusParameterError || (status == kStatusOK && info.containerId == 0))
@@ -46,18 +53,25 @@ std::string channelsText(int channels)
 
 std::string containerText(const AudioFileInfo& info)
 {
-    switch (info.containerId) {
-    case kRIFF:
-        return "WAVE";
-    case kFORM:
+    static constexpr std::pair<FourCC, const char*> names[] = {
+        {kRIFF, "WAVE"},         {kCaff, "CAF"},           {kCAT, "REX2"},          {fourCC("MPG3"), "MP3"},
+        {fourCC("adts"), "AAC"}, {fourCC("M4A "), "M4A"},  {fourCC("mpg4"), "MP4"}, {fourCC("flac"), "FLAC"},
+        {fourCC("OggS"), "Ogg"}, {fourCC("wma "), "WMA"},  {fourCC("NeXT"), "AU"},  {fourCC("wvpk"), "WavPack"},
+        {fourCC("MAC "), "APE"}, {fourCC("ac-3"), "AC-3"}, {fourCC("MPG2"), "MP2"},
+    };
+    if (info.containerId == kFORM)
         return fourCCText(info.formType);
-    case kCaff:
-        return "CAF";
-    case kCAT:
-        return "REX2";
-    default:
-        return fourCCText(info.containerId);
-    }
+    const auto* const known = std::find_if(std::begin(names), std::end(names),
+                                           [&](const auto& name) { return name.first == info.containerId; });
+    return known != std::end(names) ? known->second : fourCCText(info.containerId);
+}
+
+// ".mp3" and "aac " as people know them.
+std::string codingText(FourCC coding)
+{
+    std::string text = fourCCText(coding);
+    text.erase(text.find_last_not_of(' ') + 1);
+    return text.starts_with('.') ? text.substr(1) : text;
 }
 
 std::string formatText(const AudioFileInfo& info)
@@ -66,7 +80,7 @@ std::string formatText(const AudioFileInfo& info)
     if (info.compressed && (info.formatCode & 0xFFFF0000) == kWaveTag)
         return fmt::format("format 0x{:04X}", info.formatCode & 0xFFFF);
     if (info.compressed)
-        return fmt::format("{}", fourCCText(info.formatCode));
+        return codingText(info.formatCode);
     return fmt::format("{}-bit{}", info.bitsPerSample, info.floatingPoint ? " float" : "");
 }
 

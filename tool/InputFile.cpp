@@ -1,6 +1,7 @@
 #include "InputFile.h"
 
 #include "Failure.h"
+#include "platform/core/Status.h"
 
 #include <cerrno>
 #include <filesystem>
@@ -33,6 +34,22 @@ CFileRef referenceTo(const std::string& path)
     if (!reference.IsValid())
         throw Failure("its path cannot be a file URL");
     return reference;
+}
+
+void openAudio(CAudioFileIO& file, const std::string& path)
+{
+    requireOK(file.Open(referenceTo(path), 0));
+    if (file.GetEOF() == 0)
+        throw Failure("is empty");
+    if (file.Info().fileType == 0)
+        throw Failure("no audio file known here");
+}
+
+void requireDecoder(CAudioFileIO& file)
+{
+    platform::Error error;
+    if (const std::int32_t status = file.OpenDecoder(&error); status != kStatusOK)
+        throw Failure(error.code == status ? error.description : StatusText(status));
 }
 
 void openContainer(CAudioFileIO& file, const std::string& path, unsigned int mode)

@@ -11,5 +11,11 @@ void requireRegularFile(const std::string& path);
 /// The library's reference to a regular file; throws Failure, also for a path that is not UTF-8.
 CFileRef referenceTo(const std::string& path);
 
+/// Opens `path` for reading and makes sure that it is an audio file, of any kind; throws Failure.
+void openAudio(CAudioFileIO& file, const std::string& path);
+
+/// Makes ready to read what `file` holds; the Failure that it throws says what to install where that would help.
+void requireDecoder(CAudioFileIO& file);
+
 /// Opens `path` and makes sure that it holds a container; throws Failure.
 void openContainer(CAudioFileIO& file, const std::string& path, unsigned int mode);

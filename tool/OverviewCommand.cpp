@@ -5,6 +5,7 @@
 #include "FileAccess.h"
 #include "OutputFile.h"
 #include "OverviewReport.h"
+#include "OverviewStore.h"
 #include "PNGPicture.h"
 #include "SVGPicture.h"
 
@@ -61,10 +62,12 @@ void workOn(const std::string& path, const OverviewArguments& arguments, Overvie
                         .dryRun = arguments.edit.dryRun};
     std::optional<SafeEdit> edit; // ahead of the reading, so that it notices changes made meanwhile
     FileAccess access;
-    if (arguments.store)
+    if (arguments.store) {
         edit.emplace(path, arguments.edit);
-    else
+        requireRoomForOverview(path);
+    } else {
         access = accessForReading(path, arguments.edit.quiet);
+    }
     FileOverview overview =
         arguments.fromStored ? FileOverview::stored(path) : FileOverview::computed(path, arguments.edit.quiet);
     if (arguments.draws())

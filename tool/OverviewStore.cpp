@@ -6,6 +6,8 @@
 #include "audiofile/ContainerHeaders.h"
 #include "loops/overview/StoredOverview.h"
 
+#include <fmt/format.h>
+
 #include <algorithm>
 #include <cerrno>
 #include <cstring>
@@ -38,6 +40,9 @@ void refuseObjections(const std::string& path, const FileOverview& overview, std
 {
     CAudioFileIO file;
     openContainer(file, path, 0);
+    if (file.Info().frames != overview.info().frames) // of compressed sound
+        throw Failure(fmt::format("says that it has {} frames and holds {}: its overview would not be found again",
+                                  file.Info().frames, overview.info().frames));
     const FourCC id = overview.info().fileType == kCaff ? kCAFOverviewId : kOverviewId;
     if (const auto objection = objectionToAdding(file, surveyChunks(file, id), id, static_cast<std::int64_t>(size)))
         throw Failure(*objection);
@@ -63,6 +68,12 @@ void write(const std::string& path, FileOverview& overview, bool kept)
 }
 
 } // namespace
+
+void requireRoomForOverview(const std::string& path)
+{
+    CAudioFileIO file;
+    openContainer(file, path, 0);
+}
 
 StoreResult storeOverview(SafeEdit& edit, FileOverview& overview, const EditOptions& options)
 {

@@ -13,6 +13,9 @@ struct StoreResult {
     std::string backup;
 };
 
+/// Throws Failure for a file that is no container, which overviews are not stored in.
+void requireRoomForOverview(const std::string& path);
+
 /// Stores the overview in the file, in the place of the one that it has. The edit must have begun before the overview
 /// was computed. Of silence a CAF file keeps none. Throws Failure.
 StoreResult storeOverview(SafeEdit& edit, FileOverview& overview, const EditOptions& options);

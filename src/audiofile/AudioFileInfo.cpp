@@ -19,7 +19,7 @@ std::int32_t describeREX2(AudioFileInfo& info)
     return kStatusOK;
 }
 
-std::int32_t describe(FileWindow& file, AudioFileInfo& info)
+std::int32_t describe(FileWindow& file, const platform::URLRef& url, AudioFileInfo& info)
 {
     std::array<std::byte, 16> start{};
     const std::size_t there = file.readSome(start.data(), 0, start.size());
@@ -27,6 +27,8 @@ std::int32_t describe(FileWindow& file, AudioFileInfo& info)
         info.fileType = kCaff;
         return DescribeCAF(file, info);
     }
+    if (there >= 4 && loadBE<FourCC>(start.data()) == fourCC("fLaC"))
+        return DescribeFLAC(file, info);
     info.fileType = ChunkedContainerKind(start);
     switch (info.fileType) {
     case kWAVE:
@@ -36,7 +38,7 @@ std::int32_t describe(FileWindow& file, AudioFileInfo& info)
     case kREX2:
         return describeREX2(info);
     default:
-        return kStatusParameterError;
+        return url ? DescribeCompressed(*url, BytesView(start).first(there), info) : std::int32_t{kStatusParameterError};
     }
 }
 
@@ -46,14 +48,14 @@ std::int32_t GetAudioFileInfo(CFileIO& file, unsigned int /*permission*/, AudioF
 {
     // no call where none is needed
     FileWindow window(file, file.IsOpenForWriting() ? file.GetEOF() : file.LengthAtOpen());
-    return DescribeAudioFile(window, info);
+    return DescribeAudioFile(window, file.IsMemoryFile() ? nullptr : file.URL(), info);
 }
 
-std::int32_t DescribeAudioFile(FileWindow& file, AudioFileInfo& info)
+std::int32_t DescribeAudioFile(FileWindow& file, const platform::URLRef& url, AudioFileInfo& info)
 {
     info = {};
     info.fileLength = file.length();
-    return describe(file, info);
+    return describe(file, url, info);
 }
 
 void SetSampleRate(AudioFileInfo& info, double rate)

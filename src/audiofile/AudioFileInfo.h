@@ -29,7 +29,8 @@ enum TAudioBusFormat : int {
 };
 
 struct KT_EXPORT AudioFileInfo {
-    FourCC fileType = 0;             // "WAVE", "AIFF" (AIFC too), "caff", "REX2"; 0 when unknown
+    FourCC fileType = 0;             // "WAVE", "AIFF" (AIFC too), "caff", "REX2"; "MPG3", "adts", "M4A ", "mpg4",
+                                     // "flac" and others that are compressed throughout; 0 when unknown
     std::int64_t sampleRate = 44100; // frames per second, rounded
     std::int32_t bitsPerSample = 16; // of a sample's container: 24 for 20 bits in 3 bytes; 0 for compressed data
     std::int32_t channels = 1;
@@ -46,12 +47,13 @@ struct KT_EXPORT AudioFileInfo {
     float loopValue = 0;         // tempo in beats per minute; 0 without beats, frames or a sample rate
 
     // The container and the stored format.
-    FourCC containerId = 0; // "RIFF", "RF64", "BW64", "FORM", "caff", "CAT "; 0 when unknown
+    FourCC containerId = 0; // "RIFF", "RF64", "BW64", "FORM", "caff", "CAT "; else the file type
     FourCC formType = 0;    // "WAVE", "AIFF", "AIFC", "REX2"; 0 for CAF
-    FourCC formatCode = 0;  // "lpcm" for linear PCM; AIFC compression type, CAF format id, WAVE tag as "ms\hh\ll"
+    FourCC formatCode = 0;  // "lpcm" for linear PCM; AIFC compression type, CAF format id, WAVE tag as "ms\hh\ll";
+                            // ".mp3", "aac ", "alac", "flac", … elsewhere
     double exactSampleRate = 44100;
     platform::SampleFormat sampleFormat; // of linear PCM
-    bool compressed = false;             // described, not decodable as PCM
+    bool compressed = false;             // frames come from a decoder, if at all
     std::int32_t bytesPerFrame = 0;      // of linear PCM; samples left-aligned in their containers
     std::int64_t dataSize = 0;           // sample bytes that are in the file
     std::int64_t missingDataSize = 0;    // sample bytes that the header promises and the file ends ahead of
@@ -65,6 +67,11 @@ struct KT_EXPORT AudioFileInfo {
 /// Describes the file that `file` has open. 0; -39 for a file that ends in its header; kStatusParameterError for one
 /// that is no audio file known here, `info` then holding what was understood (fileType 0, fileLength). `permission` is
 /// the mode that the file was opened with. The mark stays where it was.
+///
+/// Compressed files outside the containers, MP3, AAC and M4A, are opened a second time by their path, and so not known in
+/// memory; what only the decoder module could describe is "fmt?" where it does not (platform/ConvertingReader.h says
+/// what to install). Of compressed data rate, channels and frames are what the file says, except for `bitsPerSample` 0
+/// and `dataOffset` 0; CAudioFileIO::OpenDecoder tells what the decoder finds.
 KT_EXPORT std::int32_t GetAudioFileInfo(CFileIO& file, unsigned int permission, AudioFileInfo& info);
 
 /// Channels of a bus format; 0 for values outside 1 to 14.

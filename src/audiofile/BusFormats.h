@@ -10,4 +10,4 @@
 /// The speakers of that many channels; 0 when it is open which they are. `busFormat` may be undefined.
 std::uint32_t SpeakersOf(TAudioBusFormat busFormat, int channels);
 /// The bus format of a file whose header names its speakers; undefined when it names none.
-TAudioBusFormat BusFormatOf(std::uint32_t speakers, int channels);
+KT_EXPORT TAudioBusFormat BusFormatOf(std::uint32_t speakers, int channels);

@@ -5,6 +5,7 @@
 #include "audiofile/ContainerDescriptions.h"
 #include "audiofile/FileWindow.h"
 #include "files/CFileUtil.h"
+#include "platform/ConvertingReader.h"
 #include "platform/SystemCalls.h"
 
 #include <array>
@@ -68,7 +69,7 @@ void CAudioFileIO::Describe(unsigned int permission)
 {
     if ((permission & (kFileIOReadWrite | kFileIOMemory)) == 0) {
         mWindow = std::make_unique<FileWindow>(*this, LengthAtOpen());
-        DescribeAudioFile(*mWindow, mInfo);
+        DescribeAudioFile(*mWindow, URL(), mInfo);
     } else {
         GetAudioFileInfo(*this, permission, mInfo);
     }
@@ -85,6 +86,7 @@ void CAudioFileIO::Describe(unsigned int permission)
 std::int32_t CAudioFileIO::Close()
 {
     const std::int32_t updated = UpdateHeader();
+    mDecoder.reset();
     mWindow.reset();
     mInfo = {};
     mSampleFormat = 0;

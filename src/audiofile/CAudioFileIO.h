@@ -8,6 +8,7 @@
 #include "files/CFileIO.h"
 #include "platform/AudioFileService.h"
 #include "platform/ContentType.h"
+#include "platform/core/Error.h"
 
 #include <cstdint>
 #include <functional>
@@ -15,6 +16,10 @@
 #include <optional>
 
 class FileWindow;
+
+namespace platform {
+class ConvertingReader;
+}
 
 /// One chunk of a container as a walk meets it.
 struct ChunkEntry {
@@ -89,9 +94,14 @@ public:
     /// Rewrites the header for a number of frames and sets the file's length to match.
     std::int32_t SetNumFrames(long frames);
 
-    /// Frames from `frame` on as interleaved floats in [-1, 1); `framesRead` (may be null) receives how many were
-    /// delivered, also on failure. kStatusEndOfFile when fewer than asked were there; kStatusParameterError for data
-    /// that is not linear PCM.
+    /// Makes ready to read compressed data, and puts into the description the rate, the channels and the number of
+    /// frames that the decoder finds, which its file may tell otherwise; what reads frames does so itself. 0, also for
+    /// linear PCM; "fmt?" for what nothing decodes, and then `error` (may be null) says what to install where that would
+    /// help; kStatusParameterError for a file in memory.
+    std::int32_t OpenDecoder(platform::Error* error = nullptr);
+    /// Frames from `frame` on as interleaved floats, of linear PCM in [-1, 1); `framesRead` (may be null) receives how
+    /// many were delivered, also on failure. kStatusEndOfFile when fewer than asked were there; else as OpenDecoder;
+    /// kStatusParameterError for samples that are not read.
     std::int32_t ReadFrames(float* to, long long frame, long count, long* framesRead = nullptr);
     /// Writes interleaved floats at `frame`, which is at most the frame count; the frame count grows, and the header is
     /// rewritten by UpdateHeader or Close. kStatusFileTooBig when the container cannot hold that many;
@@ -101,10 +111,10 @@ public:
     /// Told now and then how many frames of the file are done; false ends the work.
     using OverviewProgress = std::function<bool(long long framesDone, long long frames)>;
     /// A waveform overview of the whole file (loops/overview/OverviewBlock.h says how its bytes are laid out), or none:
-    /// `status` (may be null) then says why. kStatusEndOfFile for a file without frames, kStatusParameterError for data
-    /// that is not linear PCM or has more than 2,048 channels, kStatusUserCancelled when `progress` (may be empty)
-    /// returned false, else the status of the read that failed. Of a file that ends ahead of its sample data, what is
-    /// there; AudioFileInfo::missingDataSize tells. Defined in loops/overview/.
+    /// `status` (may be null) then says why. kStatusEndOfFile for a file without frames, kStatusParameterError for
+    /// samples that are not read and for more than 2,048 channels, kStatusUserCancelled when `progress` (may be empty)
+    /// returned false, else the status of OpenDecoder or of the read that failed. Of a file that ends ahead of its
+    /// sample data, what is there; AudioFileInfo::missingDataSize tells. Defined in loops/overview/.
     std::unique_ptr<KTMem> CreateOverview();
     std::unique_ptr<KTMem> CreateOverview(const OverviewProgress& progress, std::int32_t* status = nullptr);
 
@@ -137,6 +147,7 @@ public:
 
 private:
     bool IsOpenCAF() const { return mInfo.fileType == kCaff; }
+    std::int32_t ReadCompressedFrames(float* to, long long frame, long count, long& delivered);
     std::int32_t PrepareToWrite(long long frame, long count);
     void FramesWritten(long long frames);
     /// Where a chunk stands.
@@ -156,6 +167,7 @@ private:
 
     AudioFileInfo mInfo;
     std::unique_ptr<FileWindow> mWindow; // on a file that is open for reading; null otherwise
+    std::unique_ptr<platform::ConvertingReader> mDecoder; // of compressed data; null until it is read
     std::int32_t mSampleFormat = 0;
     bool mHeaderDirty = false;
     bool mHeaderOption = false;

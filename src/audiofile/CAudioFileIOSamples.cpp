@@ -57,7 +57,11 @@ std::int32_t CAudioFileIO::ReadFrames(float* to, long long frame, long count, lo
     delivered = 0;
     if (!IsOpen())
         return kStatusNotOpen;
-    if (!mInfo.IsLinearPCM() || frame < 0 || count < 0 || (to == nullptr && count > 0))
+    if (frame < 0 || count < 0 || (to == nullptr && count > 0))
+        return kStatusParameterError;
+    if (mInfo.compressed)
+        return ReadCompressedFrames(to, frame, count, delivered);
+    if (!mInfo.IsLinearPCM())
         return kStatusParameterError;
     const long long there = std::clamp<long long>(mInfo.frames - frame, 0, count);
     const long long samples = there * mInfo.channels;

@@ -10,14 +10,21 @@
 #include <functional>
 #include <optional>
 
-/// What GetAudioFileInfo does, over a window that stays in use.
-std::int32_t DescribeAudioFile(FileWindow& file, AudioFileInfo& info);
+/// What GetAudioFileInfo does, over a window that stays in use. `url` is where others may open the file; null for one in
+/// memory.
+std::int32_t DescribeAudioFile(FileWindow& file, const platform::URLRef& url, AudioFileInfo& info);
 
 // Each fills `info`, whose fileLength is set, from the file's chunks. 0, or kStatusEndOfFile when what a file of the
 // kind cannot do without is missing.
 std::int32_t DescribeWAVE(FileWindow& file, AudioFileInfo& info);
 std::int32_t DescribeAIFF(FileWindow& file, AudioFileInfo& info);
 std::int32_t DescribeCAF(FileWindow& file, AudioFileInfo& info);
+std::int32_t DescribeFLAC(FileWindow& file, AudioFileInfo& info);
+/// A file in none of these containers, which begins with `start`; as platform::describeCompressedAudio.
+std::int32_t DescribeCompressed(const platform::URL& url, BytesView start, AudioFileInfo& info);
+
+/// The type code by which hosts know a file that the platform's services may name otherwise.
+FourCC HostFileType(FourCC type);
 
 /// Sets the sample rate: as it is, and rounded. What is no rate (NaN, infinite, negative, beyond 2^53) gives 0.
 void SetSampleRate(AudioFileInfo& info, double rate);

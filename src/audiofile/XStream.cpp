@@ -1,5 +1,6 @@
 #include "audiofile/XStream.h"
 
+#include "audiofile/ContainerDescriptions.h"
 #include "files/CFileRef.h"
 #include "platform/ConvertingReader.h"
 #include "platform/core/Status.h"
@@ -121,15 +122,6 @@ std::int32_t readFrames(XStreamRef stream, std::int64_t position, std::uint32_t&
     return status;
 }
 
-/// The type code by which a file is known to callers of streams.
-FourCC streamFileType(FourCC type)
-{
-    return type == fourCC("AIFC")   ? fourCC("AIFF")
-           : type == fourCC("m4af") ? fourCC("M4A ")
-           : type == fourCC("mp4f") ? fourCC("mpg4")
-                                    : type;
-}
-
 std::int32_t fileTypeProperty(AudioHandle& reader, std::uint32_t& size, void* data)
 {
     FourCC type = 0;
@@ -141,7 +133,7 @@ std::int32_t fileTypeProperty(AudioHandle& reader, std::uint32_t& size, void* da
         if (file->property(AudioFile::fileTypeProperty, typeSize, &type) != kStatusOK)
             type = 0;
     }
-    type = streamFileType(type);
+    type = HostFileType(type);
     std::memcpy(data, &type, sizeof type);
     return kStatusOK;
 }

@@ -214,11 +214,45 @@ TEST(XStream, ClientFormatAndLayoutAreSetOrTheStreamIsNotOpened)
     EXPECT_EQ(wrong.status, kStatusParameterError);
     EXPECT_EQ(wrong.handle, nullptr);
     EXPECT_EQ(Stream(path, 0, nullptr, &mono).status, 0); // without a format it is not looked at
-    client.sampleRate = 22050;
-    const Stream slower(path, 0, &client);
-    EXPECT_EQ(slower.status, 0x666D743F);
-    EXPECT_EQ(slower.handle, nullptr);
+    client.formatId = fourCC("aac ");
+    const Stream coded(path, 0, &client);
+    EXPECT_EQ(coded.status, 0x666D743F);
+    EXPECT_EQ(coded.handle, nullptr);
     EXPECT_EQ(Stream(folder / "none").status, kStatusFileNotFound);
+}
+
+TEST(XStream, AtAnotherRatePlacesAndCountsAreOfThatRate)
+{
+    const TemporaryFolder folder;
+    const std::string path = folder / "sound";
+    writeSound(path, SF_FORMAT_WAV | SF_FORMAT_PCM_16, 1, 441);
+    XStreamDescription client = floats(1);
+    client.sampleRate = 48000;
+    {
+        const FakeDecoder::NoModule nothing;
+        const Stream refused(path, 0, &client);
+        EXPECT_EQ(refused.status, 0x666D743F);
+        EXPECT_EQ(refused.handle, nullptr);
+    }
+    if (platform::decoderModule() == nullptr)
+        GTEST_SKIP() << "the decoder module is not built";
+    const Stream stream(path, 0, &client);
+    ASSERT_EQ(stream.status, 0);
+    float whole[500], block[100];
+    std::uint32_t read = 0;
+    ASSERT_EQ(XStreamReadFramesSync(stream.handle, 0, 500, &read, whole, nullptr), 0);
+    EXPECT_EQ(read, 480U);
+    ASSERT_EQ(XStreamReadFramesSync(stream.handle, 450, 100, &read, block, nullptr), 0);
+    EXPECT_EQ(read, 30U);
+    EXPECT_EQ(std::memcmp(block, whole + 450, 30 * sizeof(float)), 0);
+    std::int64_t frames = 0;
+    std::uint32_t size = sizeof frames;
+    EXPECT_EQ(XStreamGetProperty(stream.handle, fourCC("#frm"), &size, &frames), 0);
+    EXPECT_EQ(frames, 441);
+    const std::size_t before = allocationCount();
+    for (std::int64_t position = 0; position < 480; position += 48)
+        ASSERT_EQ(XStreamReadFramesSync(stream.handle, position, 48, nullptr, block, nullptr), 0);
+    EXPECT_EQ(allocationCount(), before);
 }
 
 TEST(XStream, CodedFilesAreCheckedWhenTheyAreOpened)

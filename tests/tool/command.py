@@ -3,6 +3,7 @@ import json
 import os
 import pathlib
 import pty
+import re
 import shutil
 import struct
 import subprocess
@@ -11,6 +12,11 @@ import unittest
 
 KTFILES = os.environ["KTFILES"]
 MEDIA = pathlib.Path(os.environ["KTFILES_MEDIA"])
+# What the command is linked to.
+LIBRARY = pathlib.Path(re.search(r"=> (\S*/libKTFiles\.so\S*)",
+                                 subprocess.run(["ldd", KTFILES], capture_output=True, text=True).stdout).group(1))
+needs_decoders = unittest.skipUnless((LIBRARY.parent / "ktfiles/libktfiles-decoders.so").exists(),
+                                     "the decoder module is not built")
 
 
 def chunk(chunk_id, body, order="<", size=None):
@@ -51,6 +57,20 @@ class CommandTest(unittest.TestCase):
                                 **options)
         self.assertEqual(result.returncode, status, (arguments, result.stdout, result.stderr))
         return result
+
+    def without_decoders(self):
+        """An environment in which no decoder module lies beside the library."""
+        folder = tempfile.mkdtemp(prefix="ktfiles-library-")
+        self.addCleanup(shutil.rmtree, folder)
+        shutil.copy(LIBRARY, folder)
+        return {**os.environ, "LD_LIBRARY_PATH": folder}
+
+    def encoded(self, name, *options, seconds=1, rate=44100):
+        """A file of a stereo sine, made by ffmpeg; its frames before they were encoded are seconds x rate."""
+        source = f"sine=f=440:r={rate}:d={seconds}"
+        subprocess.run(["ffmpeg", "-v", "error", "-f", "lavfi", "-i", source, "-ac", "2", *options, self.folder / name],
+                       check=True, stdin=subprocess.DEVNULL)
+        return self.folder / name
 
     def lines(self, *arguments, **options):
         return self.run_command(*arguments, **options).stdout.decode().splitlines()

@@ -165,7 +165,7 @@ TContainer* CFileServer::FindReplaced(const CFileRef& newFile, const char* name)
     for (TContainer* container : mFiles) {
         if (container->ref.CopyFileName().utf8() != name)
             continue;
-        if (!file.IsOpen() && file.Open(newFile, 0) != kStatusOK)
+        if (!file.IsOpen() && (file.Open(newFile, 0) != kStatusOK || file.OpenDecoder() != kStatusOK))
             return nullptr;
         const AudioFileInfo& info = file.Info();
         if (static_cast<float>(info.sampleRate) == container->sampleRate &&

@@ -84,6 +84,8 @@ void shrink(SampleArray& array, std::uint64_t samples)
 bool LoadSamples(CAudioFileIO& file, LoadedSamples& loaded)
 {
     const AudioFileInfo& info = file.Info();
+    if (file.OpenDecoder() != kStatusOK) // of compressed data, it knows best how much there is
+        return false;
     if (info.frames <= 0 || info.frames > std::numeric_limits<std::uint32_t>::max() || info.channels <= 0 ||
         info.sampleRate <= 0)
         return false;

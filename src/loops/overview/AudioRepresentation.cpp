@@ -23,7 +23,11 @@ bool isOK(const char* step, std::int32_t status)
 
 std::int32_t readSamples(CAudioFileIO& file, std::vector<float>& samples)
 {
+    if (const std::int32_t status = file.OpenDecoder(); status != kStatusOK)
+        return status;
     const AudioFileInfo& info = file.Info();
+    if (!info.compressed && !info.IsLinearPCM())
+        return kStatusParameterError;
     try {
         samples.resize(static_cast<std::size_t>(info.frames) * static_cast<std::size_t>(info.channels));
     } catch (const std::bad_alloc&) {
@@ -61,9 +65,9 @@ AudioRepresentation::newAudioRepresentationUsingCAudioFileIOWithFileURL(const pl
     CAudioFileIO file;
     if (!isOK("Open", file.Open(CFileRef(fileURL), 0)))
         return nullptr;
-    const AudioFileInfo info = file.Info();
     std::vector<float> samples;
-    const std::int32_t read = info.IsLinearPCM() ? readSamples(file, samples) : std::int32_t{kStatusParameterError};
+    const std::int32_t read = readSamples(file, samples);
+    const AudioFileInfo info = file.Info();
     const std::int32_t closed = file.Close();
     if (!isOK("Read", read) || !isOK("Close", closed))
         return nullptr;

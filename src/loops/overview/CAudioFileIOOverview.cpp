@@ -10,11 +10,27 @@ namespace {
 constexpr long kPieceSize = 128 * 1024; // stays in the processor's cache between the read and the fold
 constexpr long long kPiecesPerProgress = 32;
 
+/// Of frames as they are read: linear PCM as it is stored, other samples as floats from the decoder.
+long frameSizeOf(const AudioFileInfo& info)
+{
+    return info.compressed ? info.channels * long{sizeof(float)} : info.bytesPerFrame;
+}
+
 // Whole points where a piece holds one.
 long framesPerPiece(const AudioFileInfo& info)
 {
-    const long frames = std::max(kPieceSize / info.bytesPerFrame, 1L);
+    const long frames = std::max(kPieceSize / frameSizeOf(info), 1L);
     return frames < kOverviewFramesPerPoint ? frames : frames - frames % kOverviewFramesPerPoint;
+}
+
+/// Sets `frames` to fewer where compressed data ends ahead of what its file promises.
+std::int32_t readPiece(CAudioFileIO& file, std::byte* piece, long long frame, long& frames)
+{
+    const AudioFileInfo& info = file.Info();
+    if (!info.compressed)
+        return file.Read(piece, info.dataOffset + frame * info.bytesPerFrame, frames * info.bytesPerFrame, nullptr);
+    const std::int32_t status = file.ReadFrames(reinterpret_cast<float*>(piece), frame, frames, &frames);
+    return status == kStatusEndOfFile ? std::int32_t{kStatusOK} : status;
 }
 
 std::int32_t addSamples(CAudioFileIO& file, MDOverview& overview, const CAudioFileIO::OverviewProgress& progress)
@@ -22,18 +38,22 @@ std::int32_t addSamples(CAudioFileIO& file, MDOverview& overview, const CAudioFi
     const AudioFileInfo& info = file.Info();
     const long most = framesPerPiece(info);
     const std::unique_ptr<std::byte[]> piece(new (std::nothrow)
-                                                 std::byte[static_cast<std::size_t>(most * info.bytesPerFrame)]);
+                                                 std::byte[static_cast<std::size_t>(most * frameSizeOf(info))]);
     if (!piece)
         return kStatusOutOfMemory;
     for (long long frame = 0; frame < info.frames; frame += most) {
         if (progress && frame / most % kPiecesPerProgress == 0 && !progress(frame, info.frames))
             return kStatusUserCancelled;
-        const long frames = std::min<long long>(most, info.frames - frame);
-        const std::int32_t status =
-            file.Read(piece.get(), info.dataOffset + frame * info.bytesPerFrame, frames * info.bytesPerFrame, nullptr);
-        if (status != kStatusOK)
+        const long wanted = std::min<long long>(most, info.frames - frame);
+        long frames = wanted;
+        if (const std::int32_t status = readPiece(file, piece.get(), frame, frames); status != kStatusOK)
             return status;
-        overview.AddStored(piece.get(), info.sampleFormat, frame, frames, info.channels);
+        if (!info.compressed)
+            overview.AddStored(piece.get(), info.sampleFormat, frame, frames, info.channels);
+        else if (frames > 0)
+            overview.Add(reinterpret_cast<const float*>(piece.get()), frame, frames, info.channels);
+        if (frames < wanted)
+            break;
     }
     if (progress && !progress(info.frames, info.frames))
         return kStatusUserCancelled;
@@ -45,7 +65,9 @@ std::int32_t createOverview(CAudioFileIO& file, KTMem& block, const CAudioFileIO
     const AudioFileInfo& info = file.Info();
     if (!file.IsOpen())
         return kStatusNotOpen;
-    if (!info.IsLinearPCM() || info.channels > MDOverview::kMostChannels)
+    if (const std::int32_t status = file.OpenDecoder(); status != kStatusOK)
+        return status;
+    if ((!info.compressed && !info.IsLinearPCM()) || info.channels > MDOverview::kMostChannels)
         return kStatusParameterError;
     if (info.frames < 1)
         return kStatusEndOfFile;

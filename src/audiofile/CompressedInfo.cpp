@@ -1,0 +1,64 @@
+// Compressed audio outside the chunked containers. Published source of FLAC: RFC 9639.
+#include "audiofile/ContainerDescriptions.h"
+
+#include "platform/CompressedAudio.h"
+#include "platform/core/ByteReader.h"
+
+#include <algorithm>
+#include <limits>
+
+namespace {
+
+/// Of `info` the fields that all of these have in common.
+void setCompressed(AudioFileInfo& info, FourCC fileType, FourCC format, double rate, std::uint32_t channels,
+                   std::uint64_t frames)
+{
+    constexpr std::uint64_t most = std::numeric_limits<std::int64_t>::max();
+    info.fileType = info.containerId = fileType;
+    info.compressed = true;
+    info.formatCode = format;
+    info.bitsPerSample = 0;
+    info.channels = static_cast<std::int32_t>(std::min<std::uint32_t>(channels, 0xFFFF));
+    info.busFormat = AudioBusFormatForChannels(info.channels);
+    SetSampleRate(info, rate);
+    info.frames = static_cast<std::int64_t>(std::min(frames, most));
+}
+
+} // namespace
+
+std::int32_t DescribeFLAC(FileWindow& file, AudioFileInfo& info)
+{
+    // Behind the marker, a block header and the smallest number of frames in a block: the largest.
+    constexpr std::int64_t offset = 10;
+    constexpr std::uint64_t smallestBlock = 10; // bytes
+    std::array<std::byte, 16> bytes{};
+    if (file.read(bytes.data(), offset, bytes.size()) != kStatusOK) {
+        setCompressed(info, fourCC("flac"), fourCC("flac"), 0, 0, 0);
+        return kStatusEndOfFile;
+    }
+    const std::uint64_t mostInBlock = loadBE<std::uint16_t>(bytes.data());
+    // Bits: 20 rate, 3 channels - 1, 5 of a sample - 1, 36 frames.
+    const auto properties = loadBE<std::uint64_t>(bytes.data() + 8);
+    const std::uint64_t capacity = static_cast<std::uint64_t>(info.fileLength) / smallestBlock * mostInBlock;
+    setCompressed(info, fourCC("flac"), fourCC("flac"), static_cast<double>(properties >> 44),
+                  static_cast<std::uint32_t>(properties >> 41 & 7) + 1, std::min(properties & 0xFFFFFFFFF, capacity));
+    return kStatusOK;
+}
+
+std::int32_t DescribeCompressed(const platform::URL& url, BytesView start, AudioFileInfo& info)
+{
+    platform::CompressedAudio audio;
+    const std::int32_t status = platform::describeCompressedAudio(url, start, audio);
+    if (audio.fileType != 0)
+        setCompressed(info, HostFileType(audio.fileType), audio.format.formatId, audio.format.sampleRate,
+                      audio.format.channelsPerFrame, audio.frames);
+    return status;
+}
+
+FourCC HostFileType(FourCC type)
+{
+    return type == fourCC("AIFC")   ? fourCC("AIFF")
+           : type == fourCC("m4af") ? fourCC("M4A ")
+           : type == fourCC("mp4f") ? fourCC("mpg4")
+                                    : type;
+}

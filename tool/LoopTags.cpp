@@ -3,6 +3,7 @@
 #include "InputFile.h"
 #include "LoopTagFields.h"
 #include "Output.h"
+#include "audiofile/CAudioFileIO.h"
 #include "audiofile/ContainerHeaders.h"
 #include "loops/VireoLoopUserDataUtils.h"
 
@@ -26,7 +27,7 @@ Chunk& addChunk(VireoLoopChunkList& list)
     return added;
 }
 
-void readLength(AudioFile& file, LoopTags& tags)
+void readLength(AudioFile& file, const std::string& path, LoopTags& tags)
 {
     platform::StreamDescription format;
     std::uint64_t packets = 0;
@@ -34,6 +35,9 @@ void readLength(AudioFile& file, LoopTags& tags)
         return;
     tags.sampleRate = format.sampleRate;
     tags.frames = packets * format.framesPerPacket;
+    CAudioFileIO description;
+    if (!format.isLinearPCM() && description.Open(referenceTo(path), 0) == kStatusOK)
+        tags.frames = static_cast<std::uint64_t>(description.Info().frames); // without what fills packets up
 }
 
 // The size of a chunk's body; none when the file does not have it.
@@ -254,7 +258,7 @@ LoopTags readLoopTags(const std::string& path)
     tags.info = std::move(info.fileInfo()).dataDictionary();
     tags.combined = std::move(combined.tags()).dataDictionary();
     tags.transients = transients.transients().transients();
-    readLength(*manager.audioFile(), tags);
+    readLength(*manager.audioFile(), path, tags);
     tags.chunks = carriedChunks(*manager.audioFile(), tags.fileType);
     return tags;
 }

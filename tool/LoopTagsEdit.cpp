@@ -214,27 +214,13 @@ private:
     bool first_ = true;
 };
 
-void write(const std::string& path, const TagsPlan& plan)
-{
-    bool written = false;
-    {
-        VireoLoopChunksManager manager = openLoopFile(path, platform::AudioFile::Permission::readWrite);
-        errno = 0;
-        written = plan.write(manager);
-    }
-    if (!written)
-        throw Failure(errno != 0 ? systemErrorText(errno) : "its tags cannot be written");
-    if (const auto wrong = differences(readLoopTags(path), plan.after); !wrong.empty())
-        throw Failure("the tags are not found as they should be after the edit: " + wrong.front().key);
-}
-
 void editFile(const std::string& path, const TagsEditor& editor, const EditOptions& options, EditReport& report)
 {
     SafeEdit edit(path, options);
     const TagsPlan plan = editor.plan(readLoopTags(edit.target()), edit.target());
     std::string backup;
     if (!options.dryRun && !plan.changes.empty())
-        backup = edit.apply([&](const std::string& copy) { write(copy, plan); });
+        backup = edit.apply([&](const std::string& copy) { writeTags(copy, plan); });
     report.add(path, plan, backup);
 }
 
@@ -303,6 +289,20 @@ bool writeFileInfo(VireoLoopChunksManager& manager, const Dictionary& before, co
     return (changed.empty() && gone.empty()) ||
            writeChunk<VireoLoopFileInfoChunk>(
                manager, [&](VireoLoopFileInfoChunk& chunk) { chunk.fileInfo().setDataDictionary(after); });
+}
+
+void writeTags(const std::string& path, const TagsPlan& plan)
+{
+    bool written = false;
+    {
+        VireoLoopChunksManager manager = openLoopFile(path, platform::AudioFile::Permission::readWrite);
+        errno = 0;
+        written = plan.write(manager);
+    }
+    if (!written)
+        throw Failure(errno != 0 ? systemErrorText(errno) : "its tags cannot be written");
+    if (const auto wrong = differences(readLoopTags(path), plan.after); !wrong.empty())
+        throw Failure("the tags are not found as they should be after the edit: " + wrong.front().key);
 }
 
 bool editTags(const std::vector<std::string>& files, const TagsEditor& editor, EditOptions edit,

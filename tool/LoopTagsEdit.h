@@ -42,6 +42,10 @@ bool writeFileInfo(VireoLoopChunksManager& manager, const platform::Dictionary& 
 /// Null and zero, empty texts and empty lists are no tag.
 bool isAbsent(const platform::Value& value);
 
+/// Makes the planned edit of the file itself, and reads it again. Throws Failure, also when the tags are then not found
+/// as they should be.
+void writeTags(const std::string& path, const TagsPlan& plan);
+
 /// A verb that edits. `action` is its name for JSON.
 struct TagsEditor {
     const char* action;

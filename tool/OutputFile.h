@@ -1,14 +1,50 @@
 // Results that the command writes to a file of the user's choice.
 #pragma once
 
+#include "Descriptor.h"
+#include "TemporaryFile.h"
+
+#include <cstdint>
 #include <functional>
+#include <optional>
 #include <string>
 #include <string_view>
+#include <sys/stat.h>
 
 /// Takes bytes; throws Failure when they cannot be written.
 using Sink = std::function<void(std::string_view)>;
 
-/// Writes what `produce` hands to the sink to `out`, which must not be the file `source`. A regular file takes its name
-/// when it is whole, in the place of what has it; a device or a FIFO is written as it is. Throws Failure.
+/// A file being written. A regular file takes its name when it is whole, and until then leaves what has it alone; a
+/// device or a FIFO is written as it is. Operations throw Failure.
+class OutputFile {
+public:
+    /// Whether a regular file that has the name already may be replaced.
+    enum class Existing { replace, refuse };
+
+    /// `out` must not be the file `source`.
+    OutputFile(const std::string& out, const std::string& source, Existing existing);
+
+    void write(std::string_view bytes);
+
+    /// Whether it can be gone back to, and be opened by its path until it is finished.
+    bool isRegular() const { return file_.has_value(); }
+    /// Of a regular file only.
+    void rewrite(std::int64_t offset, std::string_view bytes);
+    const std::string& path() const { return file_->path(); }
+    /// The path of the regular file that it is going to replace; empty when there is none.
+    const std::string& replaced() const { return replaced_; }
+
+    /// Without this, nothing has been written.
+    void finish();
+
+private:
+    std::string out_, target_, replaced_; // as given, and with symbolic links resolved
+    Existing existing_;
+    mode_t mode_ = 0;
+    std::optional<TemporaryFile> file_;
+    Descriptor device_;
+};
+
+/// Writes what `produce` hands to the sink to `out`, in the place of what has the name. Throws Failure.
 void writeOutputFile(const std::string& out, const std::string& source,
                      const std::function<void(const Sink&)>& produce);

@@ -21,6 +21,12 @@ _ktfiles()
         done
     fi
 
+    case $verb/$prev in
+        decode/--format) COMPREPLY=($(compgen -W 'wav aiff caf raw' -- "$cur")); return ;;
+        decode/--bits) COMPREPLY=($(compgen -W '16 24 32 f32' -- "$cur")); return ;;
+        decode/--rate) COMPREPLY=($(compgen -W '44100 48000 88200 96000' -- "$cur")); return ;;
+        decode/--channels | decode/--frames) return ;;
+    esac
     case $prev in
         --color) COMPREPLY=($(compgen -W 'auto always never' -- "$cur")); return ;;
         --from | -o | --output | --png | --svg) _filedir; return ;;
@@ -30,10 +36,10 @@ _ktfiles()
     esac
 
     if ((cword == 1)); then
-        COMPREPLY=($(compgen -W 'info pair chunks tags scan overview adm project lock locks help --help --version' -- "$cur"))
+        COMPREPLY=($(compgen -W 'info pair chunks tags scan overview adm project lock locks decode help --help --version' -- "$cur"))
     elif [[ $verb == help ]]; then
         if ((cword == 2)); then
-            COMPREPLY=($(compgen -W 'info pair chunks tags scan overview adm project lock locks' -- "$cur"))
+            COMPREPLY=($(compgen -W 'info pair chunks tags scan overview adm project lock locks decode' -- "$cur"))
         elif ((cword == 3)) && [[ $object == chunks ]]; then
             COMPREPLY=($(compgen -W 'get add remove' -- "$cur"))
         elif ((cword == 3)) && [[ $object == tags ]]; then
@@ -51,6 +57,8 @@ _ktfiles()
             tags/set | tags/remove | tags/copy) COMPREPLY=($(compgen -W "$edit $common" -- "$cur")) ;;
             overview/*) COMPREPLY=($(compgen -W "--png --svg --width --height --start --end --scale --colors --stored
                 --store $edit $common" -- "$cur")) ;;
+            decode/*) COMPREPLY=($(compgen -W "--output --format --rate --channels --bits --start --frames --force
+                $common" -- "$cur")) ;;
             lock/*) COMPREPLY=($(compgen -W "--read --write --presenter --timeout -- $common" -- "$cur")) ;;
             scan/*) COMPREPLY=($(compgen -W "--csv --threads $common" -- "$cur")) ;;
             project/media) COMPREPLY=($(compgen -W "--missing --alternative $common" -- "$cur")) ;;

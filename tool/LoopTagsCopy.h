@@ -1,0 +1,25 @@
+// All that makes a loop, carried from one file to another, AIFF and CAF in either direction.
+#pragma once
+
+#include "LoopTags.h"
+#include "LoopTagsEdit.h"
+#include "loops/VireoLoopChunks.h"
+
+#include <memory>
+#include <string>
+
+/// The loop of the file that is copied from, in whole.
+struct LoopSource {
+    LoopTags tags;
+    VireoLoopChunkList chunks = VireoLoopChunks::Empty();
+
+    bool isEmpty() const { return !tags.isLoop() && tags.info.empty(); }
+};
+
+/// Throws Failure.
+std::shared_ptr<LoopSource> readLoopSource(const std::string& path);
+
+/// What of it changes in the file `target`, whose tags are `before`: each takes the place of what is there, what the
+/// source does not have stays. Throws Failure.
+TagsPlan planTagsCopy(const std::shared_ptr<const LoopSource>& source, const LoopTags& before,
+                      const std::string& target);

@@ -1,5 +1,7 @@
 #include "project/ProjectFileSet.h"
 
+#include "platform/core/HashSlots.h"
+
 #include <algorithm>
 #include <cstring>
 #include <functional>
@@ -7,7 +9,6 @@
 namespace {
 
 constexpr std::size_t kBlockSize = 256 * 1024;
-constexpr std::size_t kFirstSlots = 64;
 
 std::uint32_t hashOf(std::string_view path)
 {
@@ -36,7 +37,7 @@ const ProjectFileSet::Slot* ProjectFileSet::find(std::string_view path, std::uin
 bool ProjectFileSet::insert(std::string_view path)
 {
     if (2 * (paths_.size() + 1) > slots_.size())
-        grow();
+        growHashSlots(slots_);
     const std::uint32_t hash = hashOf(path);
     const auto at = static_cast<std::size_t>(find(path, hash) - slots_.data());
     if (slots_[at].number != 0)
@@ -49,20 +50,6 @@ bool ProjectFileSet::insert(std::string_view path)
 bool ProjectFileSet::contains(std::string_view path) const
 {
     return !slots_.empty() && find(path, hashOf(path))->number != 0;
-}
-
-void ProjectFileSet::grow()
-{
-    std::vector<Slot> larger(std::max(kFirstSlots, 4 * slots_.size()));
-    for (const Slot& slot : slots_) {
-        if (slot.number == 0)
-            continue;
-        std::size_t i = slot.hash;
-        while (larger[i & (larger.size() - 1)].number != 0)
-            ++i;
-        larger[i & (larger.size() - 1)] = slot;
-    }
-    slots_ = std::move(larger);
 }
 
 std::string_view ProjectFileSet::keep(std::string_view path)

@@ -38,7 +38,6 @@ private:
     };
 
     const Slot* find(std::string_view path, std::uint32_t hash) const;
-    void grow();
     std::string_view keep(std::string_view path);
 
     std::vector<Slot> slots_; // a power of two, at most half of them taken

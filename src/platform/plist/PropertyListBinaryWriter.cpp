@@ -1,6 +1,7 @@
 #include "platform/PropertyList.h"
 #include "platform/String.h"
 #include "platform/core/ByteWriter.h"
+#include "platform/core/HashSlots.h"
 #include "platform/plist/PropertyListBinary.h"
 
 #include <algorithm>
@@ -61,7 +62,6 @@ private:
     bool numberContainer(const Value& value, int depth, std::uint64_t object);
     bool numberText(const std::string& text, std::uint64_t& index);
     Slot& slotOf(const std::string& text);
-    void growSlots();
     bool mayShare(const std::string& text);
 
     bool writeObject(const Object& object);
@@ -176,7 +176,7 @@ bool Writer::numberText(const std::string& text, std::uint64_t& index)
 Writer::Slot& Writer::slotOf(const std::string& text)
 {
     if (2 * (textCount_ + 1) > slots_.size())
-        growSlots();
+        growHashSlots(slots_);
     const std::uint64_t hash = std::hash<std::string>()(text);
     for (std::size_t i = hash;; ++i) {
         Slot& slot = slots_[i & (slots_.size() - 1)];
@@ -185,21 +185,6 @@ Writer::Slot& Writer::slotOf(const std::string& text)
         if (slot.number == 0 || (slot.hash == hash && *objects_[slot.number - 1].text == text))
             return slot;
     }
-}
-
-void Writer::growSlots()
-{
-    constexpr std::size_t kFirstSlots = 64;
-    std::vector<Slot> larger(std::max(kFirstSlots, 4 * slots_.size()));
-    for (const Slot& slot : slots_) {
-        if (slot.number == 0)
-            continue;
-        std::size_t i = slot.hash;
-        while (larger[i & (larger.size() - 1)].number != 0)
-            ++i;
-        larger[i & (larger.size() - 1)] = slot;
-    }
-    slots_ = std::move(larger);
 }
 
 /// Readers refuse a list whose values unfold to far more than its size, so a long text that is used very often is

@@ -1,0 +1,25 @@
+// What hash tables with open addressing share: their slots, a power of two of them, where a collision goes to the next.
+#pragma once
+
+#include <algorithm>
+#include <cstddef>
+#include <utility>
+#include <vector>
+
+/// Makes four times as many of them, 64 at least. A slot has the `hash` by which it was placed and a `number`, which is
+/// 0 where it is free.
+template <class Slot>
+void growHashSlots(std::vector<Slot>& slots)
+{
+    constexpr std::size_t first = 64;
+    std::vector<Slot> larger(std::max(first, 4 * slots.size()));
+    for (const Slot& slot : slots) {
+        if (slot.number == 0)
+            continue;
+        std::size_t i = slot.hash;
+        while (larger[i & (larger.size() - 1)].number != 0)
+            ++i;
+        larger[i & (larger.size() - 1)] = slot;
+    }
+    slots = std::move(larger);
+}

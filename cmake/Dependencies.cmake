@@ -1,4 +1,4 @@
-# What the library stands on, found once; the reasons are in docs/decisions.md.
+# What the library stands on, found once; the reasons are in docs/decisions/.
 
 find_package(PkgConfig REQUIRED)
 pkg_check_modules(uriparser REQUIRED IMPORTED_TARGET liburiparser)

@@ -1,5 +1,5 @@
-// ADM documents: parsing against bare libxml2, which is pushed the same bytes and calls functions that do nothing; looking
-// IDs up; and the command.
+// ADM documents: parsing against bare libxml2, which is pushed the same bytes and calls functions that do nothing;
+// looking IDs up; and the command.
 #include "ADMDocuments.h"
 #include "adm/ADMDocument.h"
 

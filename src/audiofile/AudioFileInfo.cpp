@@ -38,7 +38,8 @@ std::int32_t describe(FileWindow& file, const platform::URLRef& url, AudioFileIn
     case kREX2:
         return describeREX2(info);
     default:
-        return url ? DescribeCompressed(*url, BytesView(start).first(there), info) : std::int32_t{kStatusParameterError};
+        return url ? DescribeCompressed(*url, BytesView(start).first(there), info)
+                   : std::int32_t{kStatusParameterError};
     }
 }
 

@@ -68,8 +68,8 @@ struct KT_EXPORT AudioFileInfo {
 /// that is no audio file known here, `info` then holding what was understood (fileType 0, fileLength). `permission` is
 /// the mode that the file was opened with. The mark stays where it was.
 ///
-/// Compressed files outside the containers, MP3, AAC and M4A, are opened a second time by their path, and so not known in
-/// memory; what only the decoder module could describe is "fmt?" where it does not (platform/ConvertingReader.h says
+/// Compressed files outside the containers, MP3, AAC and M4A, are opened a second time by their path, and so not known
+/// in memory; what only the decoder module could describe is "fmt?" where it does not (platform/ConvertingReader.h says
 /// what to install). Of compressed data rate, channels and frames are what the file says, except for `bitsPerSample` 0
 /// and `dataOffset` 0; CAudioFileIO::OpenDecoder tells what the decoder finds.
 KT_EXPORT std::int32_t GetAudioFileInfo(CFileIO& file, unsigned int permission, AudioFileInfo& info);

@@ -78,7 +78,9 @@ void CAudioFileIO::Describe(unsigned int permission)
     if ((permission & kFileIOReadWrite) != 0 && mInfo.IsLinearPCM()) {
         // A header with the reservation must be built with it again, or the samples would not stand behind it.
         Header header;
-        const auto length = [&](bool option) { return buildHeader(header, mInfo, mInfo.frames, mSampleFormat, option); };
+        const auto length = [&](bool option) {
+            return buildHeader(header, mInfo, mInfo.frames, mSampleFormat, option);
+        };
         mHeaderOption = length(false) != mInfo.dataOffset && length(true) == mInfo.dataOffset;
     }
 }

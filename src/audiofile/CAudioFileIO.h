@@ -96,8 +96,8 @@ public:
 
     /// Makes ready to read compressed data, and puts into the description the rate, the channels and the number of
     /// frames that the decoder finds, which its file may tell otherwise; what reads frames does so itself. 0, also for
-    /// linear PCM; "fmt?" for what nothing decodes, and then `error` (may be null) says what to install where that would
-    /// help; kStatusParameterError for a file in memory.
+    /// linear PCM; "fmt?" for what nothing decodes, and then `error` (may be null) says what to install where that
+    /// would help; kStatusParameterError for a file in memory.
     std::int32_t OpenDecoder(platform::Error* error = nullptr);
     /// Frames from `frame` on as interleaved floats, of linear PCM in [-1, 1); `framesRead` (may be null) receives how
     /// many were delivered, also on failure. kStatusEndOfFile when fewer than asked were there; else as OpenDecoder;
@@ -166,7 +166,7 @@ private:
     void Describe(unsigned int permission);
 
     AudioFileInfo mInfo;
-    std::unique_ptr<FileWindow> mWindow; // on a file that is open for reading; null otherwise
+    std::unique_ptr<FileWindow> mWindow;                  // on a file that is open for reading; null otherwise
     std::unique_ptr<platform::ConvertingReader> mDecoder; // of compressed data; null until it is read
     std::int32_t mSampleFormat = 0;
     bool mHeaderDirty = false;

@@ -10,8 +10,8 @@
 #include <functional>
 #include <optional>
 
-/// What GetAudioFileInfo does, over a window that stays in use. `url` is where others may open the file; null for one in
-/// memory.
+/// What GetAudioFileInfo does, over a window that stays in use. `url` is where others may open the file; null for one
+/// in memory.
 std::int32_t DescribeAudioFile(FileWindow& file, const platform::URLRef& url, AudioFileInfo& info);
 
 // Each fills `info`, whose fileLength is set, from the file's chunks. 0, or kStatusEndOfFile when what a file of the

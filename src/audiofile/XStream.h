@@ -75,9 +75,10 @@ KT_EXPORT int32_t XStreamOpenWithFileRef(const CFileRef* ref, uint32_t flags, ui
                                          const XStreamDescription* clientFormat,
                                          const XStreamChannelLayout* clientLayout, XStreamRef* outStream);
 /// Opens a file by its path. Without a client format (null) frames come as near to the file's own format as they can
-/// be; without one the layout is not looked at. Positions and counts are frames of the client format's rate, where "#frm"
-/// counts the file's. On failure `*outStream` is null. "fmt?" for what cannot be decoded, or not to the client format,
-/// both also for want of the decoder module (platform/ConvertingReader.h); -66566 for an MP3 file without a valid frame, unless bit 0 of `flags` is set.
+/// be; without one the layout is not looked at. Positions and counts are frames of the client format's rate, where
+/// "#frm" counts the file's. On failure `*outStream` is null. "fmt?" for what cannot be decoded, or not to the client
+/// format, both also for want of the decoder module (platform/ConvertingReader.h); -66566 for an MP3 file without a
+/// valid frame, unless bit 0 of `flags` is set.
 KT_EXPORT int32_t XStreamOpen(const char* path, uint32_t flags, uint32_t reserved1, uint32_t reserved2,
                               const XStreamDescription* clientFormat, const XStreamChannelLayout* clientLayout,
                               XStreamRef* outStream);

@@ -78,8 +78,9 @@ public:
     /// Other channel counts: one channel goes to all, all are averaged to one, else surplus channels are left out and
     /// missing ones silent. Drops the layout.
     ///
-    /// Another sample rate needs the decoder module, and on both sides 1 to 768,000 whole hertz and at most 64 channels.
-    /// Places and counts of frames are then those of the client's rate. A rate other than before sets the place to 0.
+    /// Another sample rate needs the decoder module, and on both sides 1 to 768,000 whole hertz and at most 64
+    /// channels. Places and counts of frames are then those of the client's rate. A rate other than before sets the
+    /// place to 0.
     std::int32_t setClientFormat(const StreamDescription& format, Error* error = nullptr);
     /// Which speakers the file's channels feed, as bits of WAVE's channel mask (KSAUDIO_SPEAKER), channels in their
     /// order. 0 when it does not say, and of linear PCM that the library reads itself (CAudioFileIO tells).

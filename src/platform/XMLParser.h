@@ -75,8 +75,8 @@ public:
 /// One parse of one stream. Understood are UTF-8, UTF-16, US-ASCII and ISO-8859-1. Refused, beside what is not
 /// well-formed: declarations inside a DOCTYPE (and so every entity of a document's own), tags of more than 16 KiB, a
 /// depth of more than `kXMLMaximumDepth`, comments and CDATA sections of more than 10 MB, as much white space around
-/// the root element, more than 256 namespaces that are in force at a time, more than 10,000 different names. Memory does
-/// not grow with the document.
+/// the root element, more than 256 namespaces that are in force at a time, more than 10,000 different names. Memory
+/// does not grow with the document.
 class KT_EXPORT XMLParser {
 public:
     /// Gets the number of bytes read so far, and returns false to cancel.

@@ -1,8 +1,8 @@
 #include "platform/Places.h"
 
 #include "platform/FileSystem.h"
-#include "platform/posix/MountTable.h"
 #include "platform/SmallFile.h"
+#include "platform/posix/MountTable.h"
 
 #include <array>
 #include <cstdlib>

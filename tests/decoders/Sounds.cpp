@@ -37,17 +37,61 @@ std::vector<float> sound(std::uint32_t frames, std::uint32_t channels, double sa
     return samples;
 }
 
-void writeSound(const std::string& path, std::uint32_t frames, std::uint32_t channels, double sampleRate, int bits)
+std::vector<float> roughSound(std::uint32_t frames, std::uint32_t channels, double sampleRate)
 {
-    const std::vector<float> samples = sound(frames, channels, sampleRate);
+    std::vector<float> samples(std::size_t{frames} * channels);
+    std::uint32_t noise = 1;
+    for (std::uint32_t i = 0; i < frames; ++i)
+        for (std::uint32_t c = 0; c < channels; ++c) {
+            noise = noise * 1664525 + 1013904223;
+            const double white = static_cast<double>(noise >> 8) / (1 << 23) - 1;
+            const double t = 2 * std::numbers::pi * i / sampleRate;
+            const std::uint32_t since = i % 5300; // the last attack
+            double value = 0.25 * std::sin(t * (220 + 37 * c)) + 0.1 * std::sin(t * 1318.5);
+            value += 0.7 * white * std::exp(-static_cast<double>(since) / 200);
+            switch (i / 7001 % 7) {
+            case 1:
+                value = 0;
+                break;
+            case 3:
+                value = white;
+                break;
+            case 5:
+                value = std::sin(t * (100 + c)) < 0 ? -1 : 1;
+                break;
+            default:
+                break;
+            }
+            samples[std::size_t{i} * channels + c] = static_cast<float>(std::clamp(value, -1.0, 1.0));
+        }
+    return samples;
+}
+
+namespace {
+
+void write(const std::string& path, const std::vector<float>& samples, std::uint32_t channels, double sampleRate,
+           int bits)
+{
     const auto format = StreamDescription::packedPCM(sampleRate, channels, {.bits = bits});
     Bytes bytes(samples.size() * static_cast<std::size_t>(bits / 8));
     floatToSamples(samples.data(), format.sampleFormat(), bytes.data(), samples.size());
     std::int32_t status = 0;
     const auto file = AudioFile::create(*urlOf(path), fourCC("WAVE"), format, &status, AudioFile::eraseExisting);
     ASSERT_TRUE(file) << status;
-    std::uint32_t packets = frames;
+    auto packets = static_cast<std::uint32_t>(samples.size() / channels);
     ASSERT_EQ(file->writePackets(0, packets, bytes.data()), 0);
+}
+
+} // namespace
+
+void writeSound(const std::string& path, std::uint32_t frames, std::uint32_t channels, double sampleRate, int bits)
+{
+    write(path, sound(frames, channels, sampleRate), channels, sampleRate, bits);
+}
+
+void writeRoughSound(const std::string& path, std::uint32_t frames, std::uint32_t channels, double sampleRate, int bits)
+{
+    write(path, roughSound(frames, channels, sampleRate), channels, sampleRate, bits);
 }
 
 std::unique_ptr<ConvertingReader> openReader(const std::string& path, std::int32_t* status, Error* error)

@@ -14,6 +14,12 @@ std::vector<float> sound(std::uint32_t frames, std::uint32_t channels, double sa
 /// Writes it as a WAVE file of 16 or 24 bits.
 void writeSound(const std::string& path, std::uint32_t frames, std::uint32_t channels, double sampleRate, int bits);
 
+/// A sound that makes encoders change their ways, all of them of another length: a chord, digital silence, noise at
+/// full scale, squares at full scale, and attacks; each channel has its own.
+std::vector<float> roughSound(std::uint32_t frames, std::uint32_t channels, double sampleRate);
+void writeRoughSound(const std::string& path, std::uint32_t frames, std::uint32_t channels, double sampleRate,
+                     int bits);
+
 std::unique_ptr<platform::ConvertingReader> openReader(const std::string& path, std::int32_t* status = nullptr,
                                                        platform::Error* error = nullptr);
 

@@ -147,7 +147,7 @@ std::int32_t FileDecoder::countFrames(std::uint64_t& count)
     const auto length = static_cast<std::uint64_t>(std::max<std::int64_t>(stated, 0));
     count = 0;
     std::int32_t status = kStatusOK;
-    if (numbers_ != Numbers::byCount && length > 2 * tail && length < std::uint64_t{1} << 48 && land(length, tail))
+    if (canLand() && length > 2 * tail && length < std::uint64_t{1} << 48 && land(length, tail))
         status = decodeRest(count);
     if (status == kStatusOK && count == 0)
         status = countFromStart(count);
@@ -187,6 +187,11 @@ std::int32_t FileDecoder::decodeRest(std::uint64_t& end)
 
 // Seeking.
 
+bool FileDecoder::canLand() const
+{
+    return numbers_ == Numbers::byPosition || (numbers_ == Numbers::byTime && base_ != AV_NOPTS_VALUE);
+}
+
 std::uint64_t FileDecoder::reach(std::uint64_t)
 {
     return isChained_ ? kNever : kReach + warmUp_;
@@ -197,7 +202,7 @@ std::int32_t FileDecoder::startAt(std::uint64_t& number)
     constexpr int attempts = 5;
     const bool isWhole = demuxer_.isOpen() && codec_ && codec_->isOpen(); // unless starting anew failed
     bool hasLanded = isWhole && numbers_ == Numbers::byCount && landAtCheckpoint(number);
-    const int tries = !isWhole || numbers_ == Numbers::byCount || isChained_ ? 0 : attempts;
+    const int tries = !isWhole || !canLand() || isChained_ ? 0 : attempts;
     std::uint64_t back = warmUp_;
     for (int i = 0; i < tries && !hasLanded && number > back; ++i, back = 4 * back + kReach)
         hasLanded = land(number, back);
@@ -271,16 +276,25 @@ std::int32_t FileDecoder::next(Span& span)
     return decodeNext(span);
 }
 
+/// Ogg states one time a page, and FFmpeg reckons the others from what it takes packets to last; of Vorbis it is wrong
+/// where long blocks become short ones. So there a frame tells only when it has the length that it was given.
+bool FileDecoder::tellsNumber(const AVFrame& frame) const
+{
+    if (numbers_ == Numbers::byCount || frame.pts == AV_NOPTS_VALUE)
+        return false;
+    return !isPaged_ || frame.pkt_duration == frame.nb_samples;
+}
+
 std::int32_t FileDecoder::decodeNext(Span& span)
 {
     for (;;) {
         switch (codec_->receive()) {
         case Codec::Result::frame: {
             const AVFrame& frame = decoded();
-            if (numbers_ == Numbers::byTime && base_ == AV_NOPTS_VALUE)
-                base_ = frame.pts != AV_NOPTS_VALUE ? frame.pts : 0;
+            const bool isTold = tellsNumber(frame);
+            if (isTold && numbers_ == Numbers::byTime && base_ == AV_NOPTS_VALUE)
+                base_ = frame.pts - static_cast<std::int64_t>(expected_);
             const std::int64_t origin = numbers_ == Numbers::byTime ? base_ : 0;
-            const bool isTold = numbers_ != Numbers::byCount && frame.pts != AV_NOPTS_VALUE;
             const std::uint64_t told = static_cast<std::uint64_t>(frame.pts) - static_cast<std::uint64_t>(origin);
             if (isTold && (frame.pts < origin || told >= std::min(limit_, kMostFrames)))
                 break;

@@ -18,7 +18,7 @@ public:
 private:
     /// Where the numbers of frames come from.
     enum class Numbers {
-        byTime,     // times count frames
+        byTime,     // times count frames; those of a run follow one from another, but for gaps
         byPosition, // all packets are blocks of one size, one behind the other
         byCount,    // what was decoded from the start on
     };
@@ -30,10 +30,12 @@ private:
     std::int32_t countFromStart(std::uint64_t& count);
     std::int32_t decodeRest(std::uint64_t& end);
     std::int32_t restart();
+    bool canLand() const;
     std::int64_t timeOf(std::uint64_t number) const;
     bool land(std::uint64_t number, std::uint64_t back);
     bool landAtCheckpoint(std::uint64_t number);
     std::int32_t decodeNext(Span& span);
+    bool tellsNumber(const AVFrame& frame) const;
     std::int32_t sendPacket();
     void numberPacket();
 

@@ -2,6 +2,7 @@
 #pragma once
 
 #include "adm/ADMDocument.h"
+#include "support/Media.h"
 #include "support/TemporaryFolder.h"
 
 #include <memory>
@@ -53,5 +54,5 @@ std::string raised(Work work)
 /// A whole small document: every element, nearly every reference.
 inline std::string wholeDocument()
 {
-    return std::string(textOf(readFile(KTFILES_MEDIA "/harbour.xml")));
+    return std::string(textOf(readFile(mediaPath("harbour.xml"))));
 }

@@ -3,6 +3,7 @@
 #include "MemoryAudioFile.h"
 #include "platform/core/Status.h"
 #include "support/ContainerBuilder.h"
+#include "support/Media.h"
 #include "support/TemporaryFolder.h"
 
 #include <gtest/gtest.h>
@@ -18,7 +19,7 @@ constexpr std::uint32_t kOpenSize = 0xFFFFFFFF;
 
 Bytes media(const std::string& name)
 {
-    return readFile(std::string(KTFILES_MEDIA "/") + name);
+    return readFile(mediaPath(name));
 }
 
 /// WAVE as far as the samples.

@@ -3,6 +3,7 @@
 
 #include "SoundFile.h"
 #include "support/FaultInjection.h"
+#include "support/Media.h"
 #include "support/Programs.h"
 #include "support/TemporaryFolder.h"
 
@@ -153,7 +154,7 @@ TEST(SampleAccess, OverwritesButNeverGrowsIntoWhatIsNotItsOwn)
     // Frames are overwritten in any file; a header with chunks of others is not built anew.
     for (const char* name :
          {"surround-24.wav", "kick-24-rf64.wav", "tone-16.aiff", "tone-sowt.aifc", "bell-16-be.caf"}) {
-        Bytes expected = readFile(std::string(KTFILES_MEDIA "/") + name);
+        Bytes expected = readFile(mediaPath(name));
         const std::string path = folder.write(name, expected);
         CAudioFileIO file(CFileRef(path.c_str(), false), kFileIOReadWrite);
         EXPECT_EQ(file.WriteFrames(samples.data(), file.Info().frames, 1), kStatusParameterError) << name;

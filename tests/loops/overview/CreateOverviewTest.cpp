@@ -2,6 +2,7 @@
 
 #include "OverviewImages.h"
 #include "support/FaultInjection.h"
+#include "support/Media.h"
 #include "support/Programs.h"
 #include "support/TemporaryFolder.h"
 
@@ -50,7 +51,7 @@ TEST(CreateOverview, FastRoadEqualsPlainRoadOnEveryFormat)
 TEST(CreateOverview, WhatCannotBeDrawnGivesNothingAndSaysWhy)
 {
     const platform::SampleFormat format{16, false, false, std::endian::little};
-    const Bytes compressed = readFile(KTFILES_MEDIA "/tone-adpcm.wav");
+    const Bytes compressed = readFile(mediaPath("tone-adpcm.wav"));
     const struct {
         const char* name;
         Bytes image;

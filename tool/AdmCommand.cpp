@@ -115,7 +115,7 @@ private:
     bool runFile(const std::string& path)
     {
         try {
-            const FileAccess access = accessForReading(path, options_.quiet);
+            const FileAccess access = accessForReading(path, {.quiet = options_.quiet});
             const bool tells = arguments_.isCheck || arguments_.isLenient;
             ReadDocument read = readDocument(path, arguments_, options_.quiet, tells ? Diagnose::yes : Diagnose::no);
             // To know the place of everything costs a ninth of the time, which only documents with a problem pay.

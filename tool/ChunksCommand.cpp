@@ -82,7 +82,7 @@ private:
 
 void listFile(const std::string& path, ChunkListWriter& writer, bool quiet)
 {
-    const FileAccess access = accessForReading(path, quiet);
+    const FileAccess access = accessForReading(path, {.quiet = quiet});
     CAudioFileIO file;
     openContainer(file, path, 0);
     ContainerExtent extent;

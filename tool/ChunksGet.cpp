@@ -84,7 +84,7 @@ void getFromAnywhere(const GetArguments& arguments, const OutputOptions& options
 
 void getChunk(const GetArguments& arguments, const OutputOptions& options)
 {
-    const FileAccess access = accessForReading(arguments.file, options.quiet);
+    const FileAccess access = accessForReading(arguments.file, {.quiet = options.quiet});
     if (!arguments.sidecar.empty())
         return getFromAnywhere(arguments, options);
     CAudioFileIO file;

@@ -48,9 +48,9 @@ private:
     {
         const std::string& path = file_->replaced();
         try {
-            return path.empty()
-                       ? nullptr
-                       : accessForWriting(path, platform::FileCoordinator::WritingOptions::forReplacing, quiet);
+            return path.empty() ? nullptr
+                                : accessForWriting(path, platform::FileCoordinator::WritingOptions::forReplacing,
+                                                   {.quiet = quiet});
         } catch (const Failure& failure) {
             throw Failure(path + " " + failure.what());
         }
@@ -119,7 +119,7 @@ void tellAll(const std::string& path, const DecodeSource& source, const DecodeRe
 
 DecodeResult decodeFile(const DecodeJob& job, const DecodeOptions& options)
 {
-    FileAccess access = accessForReading(job.file, options.quiet);
+    FileAccess access = accessForReading(job.file, {.quiet = options.quiet});
     DecodeSource source(job.file, options.wishes);
     DecodeTags tags(job.file);
     const DecodeFrame frame(source.sound(), *options.wishes.format);

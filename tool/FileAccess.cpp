@@ -2,53 +2,33 @@
 
 #include "Failure.h"
 #include "Parties.h"
-#include "Terminal.h"
 
 #include <fmt/core.h>
 
-#include <chrono>
-#include <condition_variable>
-#include <cstdio>
 #include <filesystem>
-#include <mutex>
+#include <functional>
 #include <system_error>
-#include <thread>
-#include <unistd.h>
 
 using platform::FileCoordinator;
 
 namespace {
 
-/// Says what is waited for when that lasts longer than a second. Its thread ends with it: threads that stayed would
-/// take the signals that an edit holds back.
-class WaitNotice {
-public:
-    WaitNotice(const std::string& path, const platform::CoordinatedItem& item, bool isWriting)
-        : thread_([this, &path, &item, isWriting](const std::stop_token& stop) {
-              std::unique_lock lock(mutex_);
-              ended_.wait_for(lock, stop, std::chrono::seconds(1), [] { return false; });
-              if (!stop.stop_requested())
-                  printWaiting(path, item, isWriting);
-          })
-    {
-    }
-
-private:
-    std::mutex mutex_;
-    std::condition_variable_any ended_;
-    std::jthread thread_; // the last: it uses the others
-};
-
-std::unique_ptr<WaitNotice> noticeOf(const std::string& path, const platform::CoordinatedItem& item, bool isWriting,
-                                     bool quiet)
+/// Opens with `open`, on another thread where others are in the way.
+FileAccess opened(const std::string& path, const platform::CoordinatedItem& item, bool isWriting,
+                  const WaitOptions& wait, const std::function<FileAccess(platform::Error*)>& open,
+                  platform::Error* error)
 {
-    if (quiet || !isTerminal(STDERR_FILENO))
-        return nullptr;
-    try {
-        return std::make_unique<WaitNotice>(path, item, isWriting);
-    } catch (const std::system_error&) { // no thread: the wait is not told
-        return nullptr;
-    }
+    struct Opening {
+        FileAccess access;
+        platform::Error error;
+    };
+    const auto opening = std::make_shared<Opening>();
+    awaitOthers(
+        path, wait, [&] { return blockersText(item, isWriting); },
+        [opening, open] { opening->access = open(&opening->error); });
+    if (error != nullptr)
+        *error = opening->error;
+    return std::move(opening->access);
 }
 
 } // namespace
@@ -66,16 +46,22 @@ platform::URLRef coordinatedURL(const std::string& path)
     return url;
 }
 
-FileAccess accessForReading(const std::string& path, bool quiet)
+FileAccess accessForReading(const std::string& path, const WaitOptions& wait)
 {
     const platform::CoordinatedItem item(coordinatedURL(path));
     if (lockAbove(item))
         return nullptr;
-    const auto notice = noticeOf(path, item, false, quiet);
-    return FileCoordinator().openForReading(item, FileCoordinator::ReadingOptions::none);
+    if (FileAccess access = FileCoordinator().tryToOpenForReading(item))
+        return access;
+    return opened(
+        path, item, false, wait,
+        [item](platform::Error* error) {
+            return FileCoordinator().openForReading(item, FileCoordinator::ReadingOptions::none, error);
+        },
+        nullptr);
 }
 
-FileAccess accessForWriting(const std::string& path, FileCoordinator::WritingOptions options, bool quiet)
+FileAccess accessForWriting(const std::string& path, FileCoordinator::WritingOptions options, const WaitOptions& wait)
 {
     const platform::CoordinatedItem item(coordinatedURL(path));
     if (const auto lock = lockAbove(item)) {
@@ -84,15 +70,13 @@ FileAccess accessForWriting(const std::string& path, FileCoordinator::WritingOpt
         throw Failure(
             fmt::format("is locked for reading by process {}, which waits for this command", lock->processID));
     }
-    const auto notice = noticeOf(path, item, true, quiet);
+    if (FileAccess access = FileCoordinator().tryToOpenForWriting(item))
+        return access;
     platform::Error error;
-    auto access = FileCoordinator().openForWriting(item, options, &error);
+    FileAccess access = opened(
+        path, item, true, wait,
+        [item, options](platform::Error* why) { return FileCoordinator().openForWriting(item, options, why); }, &error);
     if (!access)
         throw Failure("other programs cannot be held back from it: " + error.description);
     return access;
-}
-
-void printWaiting(const std::string& path, const platform::CoordinatedItem& item, bool isWriting)
-{
-    fmt::print(stderr, "ktfiles: {}: waiting for {} ...\n", printable(path), blockersText(item, isWriting));
 }

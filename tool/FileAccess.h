@@ -1,6 +1,7 @@
 // Coordinated access of the verbs to the files that they read and change.
 #pragma once
 
+#include "Waiting.h"
 #include "platform/FileCoordination.h"
 
 #include <memory>
@@ -12,13 +13,11 @@ using FileAccess = std::unique_ptr<platform::CoordinatedAccess>;
 platform::URLRef coordinatedURL(const std::string& path);
 
 /// For as long as the result lives nobody has write access. Null where the system refuses coordination: the file is
-/// then read without it; and under a `ktfiles lock` of the file, which runs this process. Waits, and says so on a
-/// terminal unless `quiet`. Throws Failure.
-FileAccess accessForReading(const std::string& path, bool quiet);
+/// then read without it; and under a `ktfiles lock` of the file, which runs this process. Throws Failure, also when the
+/// time is up.
+FileAccess accessForReading(const std::string& path, const WaitOptions& wait);
 
 /// For as long as the result lives nobody else has access. Null under a `ktfiles lock` of the file that holds others
-/// back already. Throws Failure, also where the system refuses coordination.
-FileAccess accessForWriting(const std::string& path, platform::FileCoordinator::WritingOptions options, bool quiet);
-
-/// "ktfiles: FILE: waiting for process 12 (bounce) ...", on standard error.
-void printWaiting(const std::string& path, const platform::CoordinatedItem& item, bool isWriting);
+/// back already. Throws Failure, also where the system refuses coordination, and when the time is up.
+FileAccess accessForWriting(const std::string& path, platform::FileCoordinator::WritingOptions options,
+                            const WaitOptions& wait);

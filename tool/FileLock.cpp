@@ -1,7 +1,12 @@
 #include "FileLock.h"
 
+#include "Descriptor.h"
+#include "Failure.h"
+#include "Parties.h"
+
 #include <cerrno>
 #include <fcntl.h>
+#include <memory>
 #include <unistd.h>
 
 namespace {
@@ -28,7 +33,17 @@ LockResult tryLock(int descriptor)
     return errno == EAGAIN || errno == EACCES ? LockResult::busy : LockResult::unsupported;
 }
 
-bool waitForLock(int descriptor)
+bool waitForLock(int descriptor, const std::string& path, const WaitOptions& wait)
 {
-    return lockWhole(descriptor, F_OFD_SETLKW) == 0;
+    if (const LockResult result = tryLock(descriptor); result != LockResult::busy)
+        return result == LockResult::locked;
+    // The lock is the open file's: had too late it goes with the last of its descriptors, which is this copy.
+    const auto copy = std::make_shared<Descriptor>(::fcntl(descriptor, F_DUPFD_CLOEXEC, 0));
+    if (!*copy)
+        throw Failure(systemErrorText(errno));
+    const auto result = std::make_shared<int>(-1);
+    awaitOthers(
+        path, wait, [&] { return lockersText(descriptor); },
+        [copy, result] { *result = lockWhole(copy->get(), F_OFD_SETLKW); });
+    return *result == 0;
 }

@@ -16,7 +16,7 @@ namespace {
 
 AudioFileInfo describe(const std::string& path, bool quiet)
 {
-    const FileAccess access = accessForReading(path, quiet);
+    const FileAccess access = accessForReading(path, {.quiet = quiet});
     CFileIO file;
     requireOK(file.OpenRead(referenceTo(path), 0));
     AudioFileInfo info;

@@ -27,8 +27,6 @@ using Clock = std::chrono::steady_clock;
 using Seconds = std::chrono::duration<double>;
 
 constexpr double kLongestTimeout = 1e8; // three years
-// Even what is free takes a moment to be had.
-constexpr Seconds kShortestWait{0.1};
 
 struct LockArguments {
     std::string file;
@@ -121,15 +119,15 @@ void awaitLock(Holder& holder, const LockArguments& arguments, const platform::U
     const auto start = Clock::now();
     const auto end =
         arguments.timeout
-            ? start + std::chrono::duration_cast<Clock::duration>(std::max(Seconds(*arguments.timeout), kShortestWait))
+            ? start + std::chrono::duration_cast<Clock::duration>(Seconds(std::max(*arguments.timeout, kShortestWait)))
             : Clock::time_point::max();
     const auto notice = start + std::chrono::seconds(1);
     const platform::CoordinatedItem item(url);
-    if (!quiet && isTerminal(STDERR_FILENO) && notice < end && !holder.isHadBy(notice))
-        printWaiting(arguments.file, item, arguments.isWriting());
+    if (!quiet && notice < end && !holder.isHadBy(notice))
+        printWaiting(arguments.file, blockersText(item, arguments.isWriting()));
     if (arguments.timeout && !holder.isHadBy(end))
-        throw Failure(fmt::format("still in use by {} after {:g} seconds; nothing was run",
-                                  blockersText(item, arguments.isWriting()), *arguments.timeout));
+        throw Failure(stillInUseText(blockersText(item, arguments.isWriting()), *arguments.timeout) +
+                      "; nothing was run");
     holder.await();
 }
 

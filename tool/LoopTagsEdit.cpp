@@ -311,7 +311,7 @@ bool editTags(const std::vector<std::string>& files, const TagsEditor& editor, E
     edit.quiet = output.quiet;
     for (const std::string& path : files)
         try {
-            const FileAccess access = accessForReading(path, output.quiet);
+            const FileAccess access = accessForReading(path, {.quiet = output.quiet});
             editor.plan(readLoopTags(path), path);
         } catch (const Failure&) { // reported when its turn comes
         }

@@ -66,7 +66,7 @@ void workOn(const std::string& path, const OverviewArguments& arguments, Overvie
         edit.emplace(path, arguments.edit);
         requireRoomForOverview(path);
     } else {
-        access = accessForReading(path, arguments.edit.quiet);
+        access = accessForReading(path, {.quiet = arguments.edit.quiet});
     }
     FileOverview overview =
         arguments.fromStored ? FileOverview::stored(path) : FileOverview::computed(path, arguments.edit.quiet);

@@ -4,10 +4,16 @@
 
 #include <fmt/format.h>
 
+#include <algorithm>
 #include <cstdio>
+#include <cstdlib>
+#include <fcntl.h>
+#include <filesystem>
 #include <fstream>
 #include <map>
 #include <set>
+#include <sstream>
+#include <sys/stat.h>
 #include <unistd.h>
 #include <vector>
 
@@ -49,6 +55,76 @@ const std::set<int>& locksAbove()
     return found;
 }
 
+using Processes = std::map<int, std::string>; // each once, with its name in words
+
+void addTo(Processes& processes, int id)
+{
+    processes.try_emplace(id, fmt::format("{} ({})", id, printable(processName(id))));
+}
+
+std::string textOf(const Processes& processes)
+{
+    if (processes.empty())
+        return "another process";
+    std::string text = processes.size() == 1 ? "process " : "processes ";
+    for (std::size_t number = 0; const auto& [id, words] : processes) {
+        text += number == 0 ? "" : number + 1 == processes.size() ? " and " : ", ";
+        text += words;
+        ++number;
+    }
+    return text;
+}
+
+enum class FileLockKind { none, read, write };
+
+/// "lock:	1: POSIX  ADVISORY  READ 17 fe:01:1234 0 EOF", and OFDLCK for a lock of the open file: the two kinds
+/// that are in each other's way.
+FileLockKind lockIn(const std::filesystem::path& descriptorInformation)
+{
+    FileLockKind found = FileLockKind::none;
+    std::ifstream file(descriptorInformation);
+    for (std::string line; std::getline(file, line);) {
+        std::istringstream words(line);
+        std::string label, number, kind, advisory, access;
+        if (words >> label >> number >> kind >> advisory >> access && label == "lock:" &&
+            (kind == "POSIX" || kind == "OFDLCK"))
+            found = access == "WRITE" ? FileLockKind::write : std::max(found, FileLockKind::read);
+    }
+    return found;
+}
+
+struct OpenFile {
+    int processID;
+    std::filesystem::path descriptorInformation;
+};
+
+/// Where other processes that this one may look into have the file open.
+std::vector<OpenFile> othersWith(int descriptor)
+{
+    // What is known of a file is enough: a server that does not answer must not be waited for here.
+    constexpr int kAsKnown = AT_STATX_DONT_SYNC | AT_NO_AUTOMOUNT;
+    std::vector<OpenFile> found;
+    struct statx wanted = {};
+    if (::statx(descriptor, "", AT_EMPTY_PATH | kAsKnown, STATX_INO, &wanted) != 0)
+        return found;
+    std::error_code ignored; // processes end while they are looked at
+    for (const auto& process : std::filesystem::directory_iterator("/proc", ignored)) {
+        const int id = std::atoi(process.path().filename().c_str());
+        if (id <= 0 || id == ::getpid())
+            continue;
+        std::error_code notOurs;
+        for (std::filesystem::directory_iterator one(process.path() / "fd", notOurs), end; !notOurs && one != end;
+             one.increment(notOurs)) {
+            struct statx open = {};
+            if (::statx(AT_FDCWD, one->path().c_str(), kAsKnown, STATX_INO, &open) == 0 &&
+                open.stx_ino == wanted.stx_ino && open.stx_dev_major == wanted.stx_dev_major &&
+                open.stx_dev_minor == wanted.stx_dev_minor)
+                found.push_back({id, process.path() / "fdinfo" / one->path().filename()});
+        }
+    }
+    return found;
+}
+
 } // namespace
 
 std::string processName(int processID)
@@ -61,20 +137,25 @@ std::string processName(int processID)
 
 std::string blockersText(const platform::CoordinatedItem& item, bool isWriting)
 {
-    std::map<int, std::string> blockers; // each process once
+    Processes blockers;
     for (const platform::CoordinationParty& party : platform::coordinationParties(item))
         if (isInTheWay(party, isWriting))
-            blockers[party.processID] =
-                fmt::format("{} ({})", party.processID, printable(processName(party.processID)));
-    if (blockers.empty())
-        return "another process";
-    std::string text = blockers.size() == 1 ? "process " : "processes ";
-    for (std::size_t number = 0; const auto& [id, words] : blockers) {
-        text += number == 0 ? "" : number + 1 == blockers.size() ? " and " : ", ";
-        text += words;
-        ++number;
-    }
-    return text;
+            addTo(blockers, party.processID);
+    return textOf(blockers);
+}
+
+std::string lockersText(int descriptor)
+{
+    Processes lockers;
+    FileLockKind kind = FileLockKind::none;
+    for (const OpenFile& open : othersWith(descriptor))
+        if (const FileLockKind one = lockIn(open.descriptorInformation); one != FileLockKind::none) {
+            addTo(lockers, open.processID);
+            kind = std::max(kind, one);
+        }
+    const char* const verb = lockers.size() > 1 ? "have" : "has";
+    return fmt::format("{}, which {} locked it{}", textOf(lockers), verb,
+                       kind == FileLockKind::read ? " for reading" : "");
 }
 
 std::optional<platform::CoordinationParty> lockAbove(const platform::CoordinatedItem& item)

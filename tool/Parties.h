@@ -13,6 +13,11 @@ std::string processName(int processID);
 /// is to be seen, "another process".
 std::string blockersText(const platform::CoordinatedItem& item, bool isWriting);
 
+/// Those that have locked the open file itself, as other programs do, though they know nothing of coordination:
+/// "process 12 (bounce), which has locked it for reading". When none is to be seen, "another process, which has locked
+/// it".
+std::string lockersText(int descriptor);
+
 /// What a `ktfiles lock` that runs this process has of the item: it waits for us, so that nobody here must wait for it.
 /// Of a lock for reading and one for writing, the latter.
 std::optional<platform::CoordinationParty> lockAbove(const platform::CoordinatedItem& item);

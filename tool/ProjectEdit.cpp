@@ -13,7 +13,7 @@ void editProject(const std::string& package, const std::function<void()>& edit)
     const Descriptor folder(::open(package.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
     if (!folder)
         throw Failure(systemErrorText(errno));
-    const FileAccess access = accessForWriting(package, platform::FileCoordinator::WritingOptions::none, false);
+    const FileAccess access = accessForWriting(package, platform::FileCoordinator::WritingOptions::none, {});
     const SignalHold hold;
     edit();
 }

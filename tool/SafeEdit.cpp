@@ -42,9 +42,9 @@ FileAccess accessFor(const std::string& target, const EditOptions& options)
 {
     using WritingOptions = platform::FileCoordinator::WritingOptions;
     return options.dryRun
-               ? accessForReading(target, options.quiet)
+               ? accessForReading(target, {.quiet = options.quiet})
                : accessForWriting(target, options.inPlace ? WritingOptions::none : WritingOptions::forReplacing,
-                                  options.quiet);
+                                  {.quiet = options.quiet});
 }
 
 } // namespace
@@ -77,11 +77,7 @@ void SafeEdit::open()
 void SafeEdit::waitForOthers()
 {
     // Without locks on this file system the check before the rename is what is left.
-    if (tryLock(file_.get()) != LockResult::busy)
-        return;
-    if (!options_.quiet && isTerminal(STDERR_FILENO))
-        fmt::print(stderr, "ktfiles: {}: waiting for another edit\n", printable(target_));
-    waitForLock(file_.get());
+    waitForLock(file_.get(), target_, {.quiet = options_.quiet});
 }
 
 bool SafeEdit::isStillAtTarget() const

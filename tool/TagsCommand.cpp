@@ -78,7 +78,7 @@ bool runTags(const std::vector<std::string>& files, const OutputOptions& options
 {
     TagsWriter writer(options, files.size() > 1);
     return writeFileByFile(writer, files, [&](const std::string& path) {
-        const FileAccess access = accessForReading(path, options.quiet);
+        const FileAccess access = accessForReading(path, {.quiet = options.quiet});
         return readLoopTags(path);
     });
 }

@@ -97,6 +97,10 @@ public:
                                                       Error* error = nullptr) const;
     std::unique_ptr<CoordinatedAccess> openForWriting(const CoordinatedItem& item, WritingOptions options,
                                                       Error* error = nullptr) const;
+    /// Access that is there for the asking; null when somebody has, presents or waits for the item, or the system
+    /// refuses.
+    std::unique_ptr<CoordinatedAccess> tryToOpenForReading(const CoordinatedItem& item) const;
+    std::unique_ptr<CoordinatedAccess> tryToOpenForWriting(const CoordinatedItem& item) const;
     /// A write in whose accessor the presenter comes to hold the item for longer: it waits for its turn though the
     /// presenter owes an answer, since that answer would otherwise be given to a writer who finds the item held.
     bool coordinateAcquiring(const CoordinatedItem& item, const Accessor& accessor, Error* error = nullptr) const;
@@ -119,6 +123,7 @@ public:
 
 private:
     enum class Kind { reading, writing, acquiring };
+    std::unique_ptr<CoordinatedAccess> tryToOpen(const CoordinatedItem& item, Kind kind) const;
     std::unique_ptr<CoordinatedAccess> open(const CoordinatedItem& item, Kind kind, Error* error) const;
     bool coordinate(const CoordinatedItem& item, Kind kind, const Accessor& accessor, Error* error) const;
 

@@ -84,6 +84,30 @@ std::unique_ptr<CoordinatedAccess> FileCoordinator::openForWriting(const Coordin
     return open(item, Kind::writing, error);
 }
 
+std::unique_ptr<CoordinatedAccess> FileCoordinator::tryToOpenForReading(const CoordinatedItem& item) const
+{
+    return tryToOpen(item, Kind::reading);
+}
+
+std::unique_ptr<CoordinatedAccess> FileCoordinator::tryToOpenForWriting(const CoordinatedItem& item) const
+{
+    return tryToOpen(item, Kind::writing);
+}
+
+std::unique_ptr<CoordinatedAccess> FileCoordinator::tryToOpen(const CoordinatedItem& item, Kind kind) const
+{
+    if (!item.isValid())
+        return nullptr;
+    try {
+        auto access = std::make_unique<OpenAccess>(item, CoordinationDirectory::current(), presenter_.get());
+        const bool isHad =
+            kind == Kind::reading ? access->item.tryToAcquireForReading() : access->item.tryToAcquireForWriting();
+        return isHad && access->item.isSeen() ? std::move(access) : nullptr;
+    } catch (const std::system_error&) {
+        return nullptr;
+    }
+}
+
 bool FileCoordinator::coordinate(const CoordinatedItem& item, Kind kind, const Accessor& accessor, Error* error) const
 {
     const std::unique_ptr<CoordinatedAccess> access = open(item, kind, error);

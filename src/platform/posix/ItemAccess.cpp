@@ -38,23 +38,20 @@ ItemAccess::~ItemAccess()
 
 void ItemAccess::acquireForReading()
 {
-    const bool isHad = lockNow(kDataByte, LockKind::shared);
-    if (!isHad || someoneIsThere(kWriterTickets, kReaderPresence + kSlotCount, false)) {
-        if (isHad)
-            unlockByte(kDataByte);
-        acquireAskingUnderData(LockKind::shared, false);
-    }
+    if (tryToAcquireForReading())
+        return;
+    acquireAskingUnderData(LockKind::shared, false);
     isAcquired_ = true;
 }
 
 void ItemAccess::acquireForWriting(bool mayGoFirst)
 {
-    if (!tryWholeWrite()) {
-        if (mayGoFirst && own_ != nullptr && PresenterRegistry::shared().owesQueue(own_))
-            acquireAskingUnderData(LockKind::exclusive, true);
-        else
-            acquireInQueue();
-    }
+    if (tryToAcquireForWriting())
+        return;
+    if (mayGoFirst && own_ != nullptr && PresenterRegistry::shared().owesQueue(own_))
+        acquireAskingUnderData(LockKind::exclusive, true);
+    else
+        acquireInQueue();
     isAcquired_ = true;
 }
 
@@ -129,15 +126,26 @@ void ItemAccess::acquireAskingUnderData(LockKind kind, bool isWriter)
     }
 }
 
+/// Data, and nobody who waits or presents.
+bool ItemAccess::tryToAcquireForReading()
+{
+    if (!lockNow(kDataByte, LockKind::shared))
+        return false;
+    if (!someoneIsThere(kWriterTickets, kReaderPresence + kSlotCount, false))
+        return isAcquired_ = true;
+    unlockByte(kDataByte);
+    return false;
+}
+
 /// Queue and data in one step, and nobody who waits or presents.
-bool ItemAccess::tryWholeWrite()
+bool ItemAccess::tryToAcquireForWriting()
 {
     const ByteRange both = window_.range(kDataByte, 2);
     static_assert(kQueueByte == kDataByte + 1);
     if (!tryLock(number(), both, LockKind::exclusive))
         return false;
     if (!someoneIsThere(kWriterPresence, kReaderTickets + kTicketCount, true))
-        return true;
+        return isAcquired_ = true;
     unlock(number(), both);
     return false;
 }

@@ -25,11 +25,13 @@ public:
     /// for the queue while `own` owes an answer to the writer that keeps it.
     void acquireForReading();
     void acquireForWriting(bool mayGoFirst);
+    /// These do not wait: false, and nothing is held, when somebody has, presents or waits for the item.
+    bool tryToAcquireForReading();
+    bool tryToAcquireForWriting();
     /// False when what was acquired is worth nothing, because the folder was deleted meanwhile.
     bool isSeen() { return directory_->stillThere(stripe_); }
 
 private:
-    bool tryWholeWrite();
     void acquireInQueue();
     void askInQueue();
     void acquireAskingUnderData(LockKind kind, bool isWriter);

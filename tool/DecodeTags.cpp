@@ -34,12 +34,16 @@ CarriedTags DecodeTags::carryTo(const std::string& output, const std::string& co
         return carried;
     if (sound.sampleRate != sourceRate && sourceRate > 0)
         scaleTransients(sound.sampleRate / sourceRate);
-    const TagsPlan plan = planTagsCopy(source_, readLoopTags(output), output);
-    if (!plan.changes.empty())
-        writeTags(output, plan);
-    for (const TagChange& change : plan.changes)
-        carried.keys.push_back(change.key);
-    carried.notKept.insert(carried.notKept.end(), plan.notKept.begin(), plan.notKept.end());
+    try {
+        const TagsPlan plan = planTagsCopy(source_, readLoopTags(output), output);
+        if (!plan.changes.empty())
+            writeTags(output, plan);
+        for (const TagChange& change : plan.changes)
+            carried.keys.push_back(change.key);
+        carried.notKept.insert(carried.notKept.end(), plan.notKept.begin(), plan.notKept.end());
+    } catch (const Failure& failure) { // nor a reason to lose it
+        carried.notKept.push_back(std::string("its tags are not carried over: ") + failure.what());
+    }
     return carried;
 }
 

@@ -21,7 +21,7 @@ public:
 
     /// Puts them into the decoded file, the transients at the frames that they have at another rate; `isWhole` tells
     /// whether all of the sound is there, for what the tags say is true of all of it only. An empty path stands for an
-    /// output that cannot be gone back to. Throws Failure.
+    /// output that cannot be gone back to.
     CarriedTags carryTo(const std::string& output, const std::string& container, const DecodedSound& sound,
                         double sourceRate, bool isWhole);
 

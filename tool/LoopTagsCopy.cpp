@@ -1,12 +1,12 @@
 #include "LoopTagsCopy.h"
 
 #include "LoopTagFields.h"
+#include "LoopTagsPatch.h"
+#include "TagsCarrier.h"
 #include "audiofile/ContainerHeaders.h"
 
 #include <algorithm>
 #include <limits>
-
-using platform::Dictionary;
 
 namespace {
 
@@ -20,23 +20,6 @@ bool isCarried(const VireoLoopBaseChunk& chunk)
 bool canHold(FourCC fileType, const VireoLoopBaseChunk& chunk)
 {
     return fileType == kCaff || chunk.aifChunkID() != 0;
-}
-
-// The texts of the source in the place of those of the target; what the source does not say stays.
-Dictionary merged(const Dictionary& from, Dictionary into)
-{
-    for (const auto& [key, text] : from)
-        into[key] = text;
-    return into;
-}
-
-void noteLosses(const LoopTags& from, const LoopTags& after, std::vector<std::string>& notKept)
-{
-    LoopTags kept = from;
-    kept.combined = after.combined;
-    for (const TagChange& change : differences(from, kept))
-        if (!change.from.is_null() && change.key != "loopFileType" && change.key != "tempo")
-            notKept.push_back(fmt::format("{} {} is not kept", change.key, change.from.dump()));
 }
 
 // A list of the source's chunks that differ from what the target has, of the kinds that need no thought.
@@ -68,7 +51,8 @@ std::vector<std::size_t> differingChunks(const LoopSource& source, const std::st
     return differing;
 }
 
-// AIFF keeps 32 bits of a frame, and a transient whose frame were cut would stand somewhere else.
+// AIFF keeps 32 bits of a frame, and a transient whose frame were cut would stand somewhere else. Of a type either
+// keeps 16 bits, with or without a sign.
 std::vector<VireoLoopTransient> transientsFor(FourCC fileType, std::vector<VireoLoopTransient> transients,
                                               std::vector<std::string>& notKept)
 {
@@ -80,22 +64,27 @@ std::vector<VireoLoopTransient> transientsFor(FourCC fileType, std::vector<Vireo
     if (transients.size() < all)
         notKept.push_back(
             fmt::format("{} transients are not kept: they lie too far for an AIFF file", all - transients.size()));
+    for (VireoLoopTransient& transient : transients)
+        transient.setTransientType(fileType == kAIFF
+                                       ? std::int32_t{static_cast<std::int16_t>(transient.transientType())}
+                                       : std::int32_t{static_cast<std::uint16_t>(transient.transientType())});
     return transients;
 }
 
-bool writeTransients(VireoLoopChunksManager& manager, const LoopSource& source,
-                     const std::vector<VireoLoopTransient>& transients)
+void carryTransients(const LoopSource& source, const LoopTags& before, TagsPlan& plan)
 {
-    for (const auto& chunk : source.chunks)
-        if (auto* const from = dynamic_cast<VireoLoopTransientChunk*>(chunk.get())) {
-            VireoLoopChunkList list;
-            list.push_back(std::make_unique<VireoLoopTransientChunk>());
-            auto& data = static_cast<VireoLoopTransientChunk&>(*list.front()).transients();
-            data = from->transients();
-            data.setTransients(transients);
-            return manager.writeChunks(list);
-        }
-    return false;
+    const auto fields = transientFieldsOf(source.bytes);
+    const auto transients = transientsFor(before.fileType, source.tags.transients, plan.notKept);
+    if (transients.empty() || !fields)
+        return;
+    plan.after.transients = transients;
+    if (transients != before.transients)
+        assignTransients(plan.bytes, transients);
+    if (transientFieldsOf(plan.bytes) == fields)
+        return;
+    assignTransientFields(plan.bytes, *fields);
+    if (transients == before.transients)
+        plan.changes.push_back({"transients", "other version, detection or division", transients.size()});
 }
 
 bool writeCarried(VireoLoopChunksManager& manager, const LoopSource& source, const std::vector<std::size_t>& chunks)
@@ -111,30 +100,31 @@ std::shared_ptr<LoopSource> readLoopSource(const std::string& path)
 {
     auto source = std::make_shared<LoopSource>();
     source->tags = readLoopTags(path);
-    openLoopFile(path, platform::AudioFile::Permission::read).readChunks(source->chunks);
+    VireoLoopChunksManager manager = openLoopFile(path, platform::AudioFile::Permission::read);
+    manager.readChunks(source->chunks);
+    source->bytes = readRawLoopTags(manager);
     return source;
 }
 
 TagsPlan planTagsCopy(const std::shared_ptr<const LoopSource>& source, const LoopTags& before,
                       const std::string& target)
 {
+    VireoLoopChunksManager manager = openLoopFile(target, platform::AudioFile::Permission::read);
+    const RawLoopTags bytes = readRawLoopTags(manager);
     TagsPlan plan;
-    LoopTags& after = plan.after = before;
-    const LoopTags& from = source->tags;
-    if (!from.combined.empty()) {
-        after.combined = keptCombinedTags(from.combined, before.fileType);
-        noteLosses(from, after, plan.notKept);
-    }
-    if (!from.transients.empty())
-        after.transients = transientsFor(before.fileType, from.transients, plan.notKept);
-    after.info = merged(from.info, before.info);
+    plan.after = before;
+    plan.bytes = bytes;
+    TagsCarrier(source->tags, source->bytes, plan.bytes, plan.notKept).carry();
+    plan.after.combined = combinedTagsOf(plan.bytes);
+    plan.after.info = infoTextsOf(plan.bytes);
+    carryTransients(*source, before, plan);
     const auto chunks = differingChunks(*source, target, plan);
-    const auto changes = differences(before, after);
+    const auto changes = differences(before, plan.after);
     plan.changes.insert(plan.changes.begin(), changes.begin(), changes.end());
-    plan.write = [source, before, after, chunks](VireoLoopChunksManager& manager) {
-        return (before.combined == after.combined || writeCombinedTags(manager, after.combined)) &&
-               (before.transients == after.transients || writeTransients(manager, *source, after.transients)) &&
-               writeFileInfo(manager, before.info, after.info) && writeCarried(manager, *source, chunks);
+    if (plan.changes.empty() && plan.bytes != bytes)
+        plan.changes.push_back({"tags", "other bytes", {}});
+    plan.write = [source, bytes, after = plan.bytes, chunks](VireoLoopChunksManager& file) {
+        return writeRawLoopTags(file, bytes, after) && writeCarried(file, *source, chunks);
     };
     return plan;
 }

@@ -11,6 +11,7 @@
 /// The loop of the file that is copied from, in whole.
 struct LoopSource {
     LoopTags tags;
+    RawLoopTags bytes;
     VireoLoopChunkList chunks = VireoLoopChunks::Empty();
 
     bool isEmpty() const { return !tags.isLoop() && tags.info.empty(); }
@@ -20,6 +21,7 @@ struct LoopSource {
 std::shared_ptr<LoopSource> readLoopSource(const std::string& path);
 
 /// What of it changes in the file `target`, whose tags are `before`: each takes the place of what is there, what the
-/// source does not have stays. Throws Failure.
+/// source does not have stays. What the target has no room for, or what cannot be read between two kinds of file, is
+/// told and costs nothing else. Throws Failure.
 TagsPlan planTagsCopy(const std::shared_ptr<const LoopSource>& source, const LoopTags& before,
                       const std::string& target);

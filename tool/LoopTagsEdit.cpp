@@ -4,9 +4,6 @@
 #include "FileAccess.h"
 #include "LoopTagFields.h"
 #include "Terminal.h"
-#include "audiofile/ContainerHeaders.h"
-#include "loops/VireoLoopUserDataUtils.h"
-#include "loops/tagging/CAFPayloads.h"
 
 #include <algorithm>
 
@@ -45,79 +42,6 @@ ordered_json chunkSizes(const LoopTags& tags)
     for (const LoopTags::Chunk& chunk : tags.chunks)
         sizes[chunk.id] = fmt::format("{} bytes", chunk.size);
     return sizes;
-}
-
-bool isBlank(const Dictionary& combined, FourCC fileType)
-{
-    return std::all_of(combined.begin(), combined.end(), [fileType](const auto& entry) {
-        // A CAF file has no place for the file type: it is always there, worked out from the other tags.
-        return isAbsent(entry.second) ||
-               (fileType == kCaff && entry.first == VireoLoopCombinedTagsChunkDataFileTypeKey);
-    });
-}
-
-// A CAF file gets its signature only when the tags say "loop", which is no tag of its own there.
-Dictionary combinedTagsFor(Dictionary combined, FourCC fileType)
-{
-    const auto isSet = [&](const char* key) {
-        const auto* number = platform::find<std::int64_t>(combined, key);
-        return number != nullptr && *number > 0;
-    };
-    if (fileType == kCaff && isSet(VireoLoopCombinedTagsChunkDataSignatureTopKey) &&
-        isSet(VireoLoopCombinedTagsChunkDataSignatureBottomKey))
-        combined[VireoLoopCombinedTagsChunkDataFileTypeKey] = 1;
-    return combined;
-}
-
-// What the library's writer of one kind of chunk makes of the file.
-template <class Chunk, class Fill>
-bool writeChunk(VireoLoopChunksManager& manager, Fill fill)
-{
-    VireoLoopChunkList list;
-    auto chunk = std::make_unique<Chunk>();
-    fill(*chunk);
-    list.push_back(std::move(chunk));
-    return list.front()->chunkData().isEmpty() ? manager.removeChunks(list) : manager.writeChunks(list);
-}
-
-// The pairs of a CAF file's basic tagging that are no tags of ours, which the library's writer leaves out.
-tagging::StringPairs otherPairs(platform::AudioFile& file)
-{
-    using Types = VireoLoopCombinedTagsChunkDataTypes;
-    constexpr std::string_view ours[] = {"beat count", "time signature", "key signature", "key type",
-                                         "category",   "subcategory",    "genre",         "descriptors"};
-    tagging::StringPairs others;
-    const auto payload = VireoLoopUUIDUserDataUtils::read(file, *chunkIDToCafChunkUUID(tagging::kBasicTagging));
-    for (const auto& [key, parts] : Types::extractSearchInfoFromData(payload.value_or(Bytes())))
-        if (std::find(std::begin(ours), std::end(ours), key) == std::end(ours))
-            others[key] = fmt::format("{}", fmt::join(parts, ","));
-    return others;
-}
-
-bool writeCAFTags(VireoLoopChunksManager& manager, const VireoLoopCombinedTagsChunkData& tags)
-{
-    using Types = VireoLoopCombinedTagsChunkDataTypes;
-    const auto payload = tags.cafDataRepresentation();
-    if (!payload)
-        return false;
-    tagging::StringPairs pairs = otherPairs(*manager.audioFile());
-    for (const auto& [key, parts] : Types::extractSearchInfoFromData(*payload))
-        pairs[key] = fmt::format("{}", fmt::join(parts, ","));
-    const auto merged = CAFInfoStringsData(pairs);
-    return merged && VireoLoopUUIDUserDataUtils::write(*manager.audioFile(),
-                                                       *chunkIDToCafChunkUUID(tagging::kBasicTagging), *merged);
-}
-
-bool writeAIFFInfo(VireoLoopChunksManager& manager, const Dictionary& changed, const std::vector<std::string>& gone)
-{
-    bool good = changed.empty() || writeChunk<VireoLoopFileInfoChunk>(manager, [&](VireoLoopFileInfoChunk& chunk) {
-                    chunk.fileInfo().setDataDictionary(changed);
-                });
-    for (const std::string& key : gone)
-        good = VireoLoopUserDataUtils::removeAll(*manager.audioFile(),
-                                                 VireoLoopFileInfoChunkDataTypes::fileInfoTypeForKey(key)) &&
-               good;
-    return good;
 }
 
 std::string inWords(const ordered_json& value)
@@ -250,47 +174,6 @@ std::vector<TagChange> differences(const LoopTags& before, const LoopTags& after
     return changes;
 }
 
-Dictionary keptCombinedTags(const Dictionary& combined, FourCC fileType)
-{
-    if (isBlank(combined, fileType))
-        return {};
-    VireoLoopCombinedTagsChunkData written, read;
-    written.setDataDictionary(combinedTagsFor(combined, fileType));
-    if (const auto bytes = written.chunkDataForAudioFileType(fileType))
-        read.setChunkData(*bytes, fileType);
-    return read.dataDictionary();
-}
-
-bool writeCombinedTags(VireoLoopChunksManager& manager, const Dictionary& combined)
-{
-    const FourCC type = manager.audioFileTypeID();
-    VireoLoopCombinedTagsChunkData tags;
-    if (!isBlank(combined, type))
-        tags.setDataDictionary(combinedTagsFor(combined, type));
-    if (type == kCaff && !tags.isEmpty())
-        return writeCAFTags(manager, tags);
-    return writeChunk<VireoLoopCombinedTaggingChunk>(
-        manager, [&](VireoLoopCombinedTaggingChunk& chunk) { chunk.tags() = tags; });
-}
-
-bool writeFileInfo(VireoLoopChunksManager& manager, const Dictionary& before, const Dictionary& after)
-{
-    Dictionary changed;
-    std::vector<std::string> gone;
-    for (const auto& [key, text] : after)
-        if (const auto old = before.find(key); old == before.end() || old->second != text)
-            changed[key] = text;
-    for (const auto& entry : before)
-        if (!after.contains(entry.first))
-            gone.push_back(entry.first);
-    if (manager.audioFileTypeID() == kAIFF)
-        return writeAIFFInfo(manager, changed, gone);
-    // The writer for CAF replaces all four texts, so that it is given all of them.
-    return (changed.empty() && gone.empty()) ||
-           writeChunk<VireoLoopFileInfoChunk>(
-               manager, [&](VireoLoopFileInfoChunk& chunk) { chunk.fileInfo().setDataDictionary(after); });
-}
-
 void writeTags(const std::string& path, const TagsPlan& plan)
 {
     bool written = false;
@@ -301,6 +184,9 @@ void writeTags(const std::string& path, const TagsPlan& plan)
     }
     if (!written)
         throw Failure(errno != 0 ? systemErrorText(errno) : "its tags cannot be written");
+    VireoLoopChunksManager manager = openLoopFile(path, platform::AudioFile::Permission::read);
+    if (readRawLoopTags(manager) != plan.bytes)
+        throw Failure("the tags are not found as they should be after the edit");
     if (const auto wrong = differences(readLoopTags(path), plan.after); !wrong.empty())
         throw Failure("the tags are not found as they should be after the edit: " + wrong.front().key);
 }

@@ -4,6 +4,7 @@
 
 #include "LoopTags.h"
 #include "Output.h"
+#include "RawLoopTags.h"
 #include "SafeEdit.h"
 
 #include <nlohmann/json.hpp>
@@ -22,7 +23,8 @@ struct TagChange {
 
 /// An edit of one file, worked out.
 struct TagsPlan {
-    LoopTags after; // as it will be read from the file
+    LoopTags after;    // as it will be read from the file
+    RawLoopTags bytes; // the same, of those that are interpreted
     std::vector<TagChange> changes;
     std::vector<std::string> notKept; // what the container has no room for, in words
     /// Does it; false when something could not be written.
@@ -32,13 +34,6 @@ struct TagsPlan {
 /// What differs, transients and carried chunks compared by number and size.
 std::vector<TagChange> differences(const LoopTags& before, const LoopTags& after);
 
-/// The combined tags as a file of the type gives them back once they are written.
-platform::Dictionary keptCombinedTags(const platform::Dictionary& combined, FourCC fileType);
-/// Writes the combined tags, or removes their chunks when nothing is left in them.
-bool writeCombinedTags(VireoLoopChunksManager& manager, const platform::Dictionary& combined);
-/// Writes the texts that differ, and removes those that are gone; leaves other texts of the file alone.
-bool writeFileInfo(VireoLoopChunksManager& manager, const platform::Dictionary& before,
-                   const platform::Dictionary& after);
 /// Null and zero, empty texts and empty lists are no tag.
 bool isAbsent(const platform::Value& value);
 

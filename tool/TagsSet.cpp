@@ -3,6 +3,7 @@
 #include "Failure.h"
 #include "LoopTagFields.h"
 #include "LoopTagsEdit.h"
+#include "LoopTagsPatch.h"
 #include "TagsCommand.h"
 #include "audiofile/ContainerHeaders.h"
 
@@ -15,7 +16,6 @@ using platform::Value;
 namespace {
 
 constexpr std::int32_t kTransientType = 1; // the one whose meaning is known
-constexpr std::int32_t kTransientsVersion = 1;
 
 bool isAssigned(const std::vector<TagAssignment>& assignments, const TagField& field)
 {
@@ -79,18 +79,19 @@ void refuseTransients(const std::string& path, const LoopTags& tags)
                         last, std::numeric_limits<std::uint32_t>::max()));
 }
 
-void assignTo(LoopTags& tags, const TagAssignment& assignment, const LoopTags& before)
+// Beats make a loop of a file that does not say what it is.
+void makeLoopOfBeats(const LoopTags& before, std::vector<TagAssignment>& assignments)
 {
-    const TagField& field = *assignment.field;
-    if (field.kind == TagField::Kind::transients) {
-        tags.transients = transientsAt(assignment.value, before);
-        return;
-    }
-    Dictionary& values = field.isFileInfo ? tags.info : tags.combined;
-    if (isAbsent(assignment.value))
-        values.erase(field.key);
-    else
-        values[field.key] = assignment.value;
+    const char* const type = VireoLoopCombinedTagsChunkDataFileTypeKey;
+    const auto named = [&](const char* key) {
+        return std::ranges::find_if(assignments, [&](const TagAssignment& each) {
+            return each.field->key != nullptr && each.field->key == std::string_view(key);
+        });
+    };
+    const auto beats = named(VireoLoopCombinedTagsChunkDataBeatCountKey);
+    if (beats != assignments.end() && !isAbsent(beats->value) && named(type) == assignments.end() &&
+        before.fileType == kAIFF && isAbsent(valueUnder(before.combined, type)))
+        assignments.emplace_back(TagAssignment{fieldsForKey("loopFileType").front(), Value(1)});
 }
 
 // A tag that was asked for and cannot be kept is a mistake on the command line; one that would be lost on the way makes
@@ -114,52 +115,64 @@ void refuseLosses(const std::string& path, const Dictionary& wanted, const Dicti
     }
 }
 
-void refuseLongComments(const std::string& path, const LoopTags& tags)
+void refuseLostTexts(const std::string& path, const LoopTags& after, const std::vector<TagAssignment>& assignments)
 {
-    const std::string comments = tags.text(VireoLoopFileInfoChunkDataCommentsKey);
-    using Types = VireoLoopFileInfoChunkDataTypes;
-    if (tags.fileType == kAIFF && !comments.empty() &&
-        Types::commentStringFromAifCommentChunkData(Types::commentDataFromAifCommentChunkStrings(comments)) != comments)
-        throw CLI::ValidationError(printable(path) + ": an AIFF file cannot keep comments that long");
+    for (const auto& [field, value] : assignments)
+        if (field->isFileInfo && !isAbsent(value) && valueUnder(after.info, field->key) != value)
+            throw CLI::ValidationError(fmt::format("{}: {} cannot keep {} that long", printable(path),
+                                                   containerPhrase(after.fileType), field->name));
 }
 
-bool writeTransients(VireoLoopChunksManager& manager, const std::vector<VireoLoopTransient>& transients)
+// What goes or is replaced though the library could not read it is told as well.
+void tellOfUnreadable(const RawLoopTags& before, const std::vector<TagAssignment>& assignments, TagsPlan& plan)
 {
-    VireoLoopChunkList list;
-    list.push_back(std::make_unique<VireoLoopTransientChunk>());
-    auto& data = static_cast<VireoLoopTransientChunk&>(*list.front()).transients();
-    manager.readChunks(list); // for the fields beside the list
-    data.setTransients(transients);
-    if (!data.version())
-        data.setVersion(kTransientsVersion);
-    return transients.empty() ? manager.removeChunks(list) : manager.writeChunks(list);
+    for (const TagAssignment& assignment : assignments) {
+        const TagField& field = *assignment.field;
+        RawLoopTags alone = before;
+        assignTags(alone, {&assignment, 1});
+        if (field.kind == TagField::Kind::transients && isAbsent(assignment.value))
+            alone.transients.reset();
+        // A signature is one thing.
+        if (alone == before || field.name == std::string_view("signatureBottom") ||
+            std::ranges::any_of(plan.changes, [&](const TagChange& change) { return change.key == field.name; }))
+            continue;
+        plan.changes.push_back({field.name, "other bytes", {}});
+        if (!isAbsent(assignment.value))
+            plan.changes.back().to = inWords(assignment.value);
+    }
 }
 
-TagsPlan planAssignments(const LoopTags& before, const std::string& path, const std::vector<TagAssignment>& assignments)
+TagsPlan planAssignments(const LoopTags& before, const std::string& path, std::vector<TagAssignment> assignments)
 {
+    VireoLoopChunksManager manager = openLoopFile(path, platform::AudioFile::Permission::read);
+    const RawLoopTags bytes = readRawLoopTags(manager);
     TagsPlan plan;
     plan.after = before;
-    for (const TagAssignment& assignment : assignments)
-        assignTo(plan.after, assignment, before);
-    Dictionary& combined = plan.after.combined;
-    if (combined != before.combined) {
-        // Beats make a loop of a file that does not say what it is.
-        const char* const type = VireoLoopCombinedTagsChunkDataFileTypeKey;
-        if (isAbsent(valueUnder(combined, type)) &&
-            !isAbsent(valueUnder(combined, VireoLoopCombinedTagsChunkDataBeatCountKey)))
-            combined[type] = 1;
-        const Dictionary kept = keptCombinedTags(combined, before.fileType);
-        refuseLosses(path, combined, kept, before.fileType, assignments);
-        combined = kept;
-    }
-    if (plan.after.transients != before.transients)
+    plan.bytes = bytes;
+    makeLoopOfBeats(before, assignments);
+    assignTags(plan.bytes, assignments);
+    Dictionary wanted = before.combined;
+    for (const auto& [field, value] : assignments)
+        if (field->kind == TagField::Kind::transients)
+            plan.after.transients = transientsAt(value, before);
+        else if (!field->isFileInfo && isAbsent(value))
+            wanted.erase(field->key);
+        else if (!field->isFileInfo)
+            wanted[field->key] = value;
+    plan.after.combined = combinedTagsOf(plan.bytes);
+    plan.after.info = infoTextsOf(plan.bytes);
+    refuseLosses(path, wanted, plan.after.combined, before.fileType, assignments);
+    refuseLostTexts(path, plan.after, assignments);
+    const bool namesTransients = std::ranges::any_of(
+        assignments, [](const auto& each) { return each.field->kind == TagField::Kind::transients; });
+    if (namesTransients && (plan.after.transients != before.transients || plan.after.transients.empty())) {
         refuseTransients(path, plan.after);
-    refuseLongComments(path, plan.after);
+        assignTransients(plan.bytes, plan.after.transients);
+    }
     plan.changes = differences(before, plan.after);
-    plan.write = [before, after = plan.after](VireoLoopChunksManager& manager) {
-        return (before.combined == after.combined || writeCombinedTags(manager, after.combined)) &&
-               (before.transients == after.transients || writeTransients(manager, after.transients)) &&
-               writeFileInfo(manager, before.info, after.info);
+    tellOfUnreadable(bytes, assignments, plan);
+    plan.write = [bytes, after = plan.bytes](VireoLoopChunksManager& file) {
+        return writeRawLoopTags(file, bytes, after);
     };
     return plan;
 }
@@ -171,12 +184,22 @@ TagsPlan planRemoval(const LoopTags& before, const std::string& path)
     plan.after.sampleRate = before.sampleRate;
     plan.after.frames = before.frames;
     plan.changes = differences(before, plan.after);
+    VireoLoopChunksManager manager = openLoopFile(path, platform::AudioFile::Permission::read);
+    const RawLoopTags bytes = readRawLoopTags(manager);
+    plan.bytes.fileType = before.fileType;
+    if (before.fileType == kCaff) { // the other texts of "info" stay as they are
+        plan.bytes.texts = bytes.texts;
+        for (const TagField& field : tagFields())
+            if (const TagAssignment removal{&field, {}}; field.isFileInfo)
+                assignTags(plan.bytes, {&removal, 1});
+    }
     if (plan.changes.empty()) { // chunks that say nothing, or that cannot be read
-        VireoLoopChunksManager manager = openLoopFile(path, platform::AudioFile::Permission::read);
         for (const LoopTags::Chunk& chunk : loopChunksOf(manager))
             plan.changes.push_back({chunk.id, fmt::format("{} bytes", chunk.size), {}});
     }
-    plan.write = [](VireoLoopChunksManager& manager) { return manager.removeChunks(VireoLoopChunks::Empty()); };
+    plan.write = [bytes, after = plan.bytes](VireoLoopChunksManager& file) {
+        return writeRawLoopTags(file, bytes, after) && file.removeChunks(VireoLoopChunks::Empty());
+    };
     return plan;
 }
 

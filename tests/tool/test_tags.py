@@ -5,6 +5,7 @@ import shutil
 import struct
 import subprocess
 import unittest
+from random import Random
 
 from command import MEDIA, CommandTest, caf
 
@@ -226,6 +227,204 @@ class Copy(TagsTest):
         self.assertEqual(shown["transients"], [{"type": 1, "frame": 7}])
         self.run_command("tags", "remove", "a.aiff")
         self.assertIn("has no loop tags", self.failure("tags", "copy", "a.aiff", "a.caf"))
+
+
+BASIC_UUID = bytes.fromhex("29819273b5bf4aefb78d62d1ef90bb2c")
+TRANSIENTS_UUID = bytes.fromhex("0352811b9d5d42e1882d6af61a6b330c")
+
+
+def pairs(*entries, behind=b""):
+    return struct.pack(">I", len(entries)) + b"".join(key + b"\0" + text + b"\0" for key, text in entries) + behind
+
+
+def comments(*texts):
+    """An AIFF "COMT": each with a time stamp and a marker."""
+    body = struct.pack(">H", len(texts))
+    for index, text in enumerate(texts):
+        body += struct.pack(">IhH", 1000 + index, 7 + index, len(text)) + text + b"\0" * (len(text) & 1)
+    return body
+
+
+class WhatIsNotNamedStays(TagsTest):
+    """Bytes that the library cannot read, or does not know, outlive an edit of the fields beside them."""
+
+    def chunks(self, name):
+        """The bodies of a file's chunks, by id, those of "uuid" by their UUID."""
+        content, position, found = (self.folder / name).read_bytes(), 12, {}
+        is_caf = content.startswith(b"caff")
+        position = 8 if is_caf else 12
+        while position < len(content):
+            chunk_id = content[position:position + 4]
+            size = struct.unpack(">q" if is_caf else ">I", content[position + 4:position + (12 if is_caf else 8)])[0]
+            position += 12 if is_caf else 8
+            body = content[position:position + size]
+            found[body[:16] if chunk_id == b"uuid" else chunk_id] = body[16:] if chunk_id == b"uuid" else body
+            position += size + (0 if is_caf else size & 1)
+        return found
+
+    def fresh_aiff(self, *chunks):
+        shutil.copy(MEDIA / "tone-16.aiff", self.folder / "a.aiff")
+        self.run_command("tags", "remove", "a.aiff")
+        aiff_with(self.folder / "a.aiff", *chunks)
+
+    def edited(self, name, *words, verb="set"):
+        before = self.chunks(name)
+        self.run_command("tags", verb, name, *words)
+        after = self.chunks(name)
+        self.assertEqual({k for k in before if k != b"free" and before[k] != after.get(k)} |
+                         {k for k in after if k not in before and k != b"free"}, self.may_change, words)
+        return before, after
+
+    def test_one_field_of_an_aiff_file(self):
+        random = Random(6)
+        noise = bytes(random.randrange(1, 256) for _ in range(400))
+        basic = struct.pack(">Ii5h", 3, 8, 57, 1, 6, 8, 1) + noise[:64] + b"tail"
+        for version, count_at in ((1, 220), (2, 322)):
+            head = bytearray(struct.pack(">I", version) + noise[:count_at - 2])
+            for offset, text in ((4, b"Dr\xFCms\0behind"), (54, b"Kick"), (104, b"Jazz\0noise")):
+                head[offset:offset + 50] = text.ljust(50, b"\0")
+            category_body = bytes(head[:count_at]) + struct.pack(">H", 2) + b"Dry".ljust(50, b"\0") + \
+                b"\xFCber".ljust(50, b"\0") + b"behind the descriptors"
+            fields = [("beatCount=9", b"basc", 4, 8), ("key=C", b"basc", 8, 10), ("mode=both", b"basc", 10, 12),
+                      ("signatureTop=3", b"basc", 12, 14), ("signatureBottom=4", b"basc", 14, 16),
+                      ("loopFileType=2", b"basc", 16, 18), ("instrumentType=Bass", b"cate", 4, 54),
+                      ("instrumentSubType=X", b"cate", 54, 104), ("genre=Rock", b"cate", 104, 154),
+                      ("genre=", b"cate", 104, 154), ("instrumentType=", b"cate", 4, 54)]
+            for word, chunk_id, start, end in fields:
+                self.fresh_aiff((b"basc", basic), (b"cate", category_body), (b"AUTH", b"J\xFCrgen"),
+                                (b"COMT", comments(b"one", b"two")))
+                self.may_change = {chunk_id}
+                before, after = self.edited("a.aiff", word)
+                for body in (before[chunk_id], after[chunk_id]):
+                    self.assertEqual(body[:start] + body[end:], before[chunk_id][:start] + before[chunk_id][end:], word)
+            self.fresh_aiff((b"basc", basic), (b"cate", category_body))
+            self.may_change = {b"cate"}
+            before, after = self.edited("a.aiff", "descriptors=A,B,C")
+            self.assertEqual(after[b"cate"][:count_at], before[b"cate"][:count_at])
+            self.assertEqual(after[b"cate"][count_at:], struct.pack(">H", 3) + b"".join(
+                text.ljust(50, b"\0") for text in (b"A", b"B", b"C")) + b"behind the descriptors")
+
+    def test_chunks_of_unknown_layout_refuse_what_is_in_them_and_no_more(self):
+        for body, said in ((category(b"Drums", version=3), "version 3"), (category(b"Drums")[:221], "cut short")):
+            self.fresh_aiff((b"cate", body))
+            self.assertIn(said, self.failure("tags", "set", "a.aiff", "genre=Rock"))
+            self.may_change = {b"basc", b"NAME"}
+            self.edited("a.aiff", "beatCount=8", "title=T")
+
+    def test_comments_of_others_and_time_stamps(self):
+        for texts, word, expected in (
+                ((b"one", b"second!"), "comments=other", comments(b" other", b"second!")),
+                ((b"one", b"second!"), "comments=odd", comments(b" odd", b"second!")),
+                ((b"one", b"second!"), "comments=", comments(b"", b"second!")),
+                ((b"one",), "comments=x", comments(b" x")[:10] + b" x" + bytes(8))):
+            self.fresh_aiff((b"COMT", comments(*texts)), (b"NAME", b"\xFC"))
+            self.may_change = {b"COMT"}
+            self.assertEqual(self.edited("a.aiff", word)[1][b"COMT"], expected)
+        self.may_change = {b"NAME"}
+        self.edited("a.aiff", "title=T")
+
+    def test_pairs_of_a_caf_file(self):
+        basic = [(b"genre", b"R,B"), (b"beat count", b"5000000000"), (b"tempo", b"120,5"), (b"\xFCber", b"caf\xE9"),
+                 (b"key signature", b"Cb"), (b"time signature", b"4/0"), (b"category", b"Dr\xFCms"), (b"zz", b""),
+                 (b"twice", b"1"), (b"twice", b"2")]
+        info = [(b"artist", b"J\xFCrgen"), (b"year", b"1999"), (b"year", b"2000"), (b"\xE9", b"x"), (b"title", b"T")]
+        for key in (b"key type", b"key signature"):  # a key without a type, a type without a key
+            entries = [(b"key type", b"minor") if each[0] == b"key signature" and key == b"key type" else each
+                       for each in basic]
+            for word, name, text in (("subcategory=S", "instrumentSubType=S", b"S"), ("genre", "genre=Jazz", b"Jazz"),
+                                     ("beat count", "beatCount=8", b"8"), ("key signature", "key=F#", b"F#"),
+                                     ("time signature", "signature=3/4", b"3/4"), ("genre", "genre=", b"")):
+                pair = word.split("=")[0].encode()
+                self.write("b.caf", caf((b"uuid", BASIC_UUID + pairs(*entries, behind=b"rest")),
+                                        (b"info", pairs(*info))))
+                self.may_change = {BASIC_UUID}
+                after = self.edited("b.caf", name)[1][BASIC_UUID]
+                expected = [(k, text if k == pair else v) for k, v in entries if k != pair or text]
+                if not any(k == pair for k, _ in entries):
+                    expected.append((pair, text))
+                self.assertEqual(after, pairs(*expected, behind=b"rest"), name)
+        for word, entry in (("title=New", (b"title", b"New")), ("artist=Me", (b"artist", b"Me"))):
+            self.write("b.caf", caf((b"uuid", BASIC_UUID + pairs(*basic)), (b"info", pairs(*info))))
+            self.may_change = {b"info"}
+            after = self.edited("b.caf", word)[1][b"info"]
+            self.assertEqual(after, pairs(*[entry if each[0] == entry[0] else each for each in info]))
+
+    def test_what_cannot_be_read_can_be_removed(self):
+        self.fresh_aiff((b"AUTH", b"J\xFCrgen"), (b"cate", category(b"Dr\xFCms", b"Kick")), (b"trns", b"short"))
+        self.may_change = {b"AUTH", b"cate", b"trns"}
+        after = self.edited("a.aiff", "artist", "instrumentType", "transients", verb="remove")[1]
+        self.assertEqual([after.get(b"AUTH"), after[b"cate"], after.get(b"trns")], [None, category(b"", b"Kick"), None])
+        self.write("b.caf", caf((b"info", pairs((b"artist", b"J\xFCrgen"), (b"\xE9", b"x")))))
+        self.may_change = {b"info"}
+        self.assertEqual(self.edited("b.caf", verb="remove")[1][b"info"], pairs((b"\xE9", b"x")))
+
+    def test_records_of_transients_that_stay(self):
+        record = struct.pack(">HHI4I", 5, 6, 50, 1, 2, 3, 4)
+        head = struct.pack(">hhhHI15I", 2, 40, 3, 9, 77, *range(15))
+        self.fresh_aiff((b"trns", head + struct.pack(">I", 2) + struct.pack(">HHI16x", 1, 0, 7) + record + b"tail"))
+        self.may_change = {b"trns"}
+        after = self.edited("a.aiff", "transients=50,60")[1][b"trns"]
+        self.assertEqual(after[:8] + after[12:72], head[:8] + head[12:])  # but the time of writing
+        self.assertEqual(after[72:], struct.pack(">I", 2) + record + struct.pack(">HHI16x", 1, 0, 60) + b"tail")
+
+
+class Losses(TagsTest):
+    """A field that the other kind of file cannot hold costs nothing but itself."""
+
+    def copied(self, source, target, *also):
+        result = self.run_command("tags", "copy", source, target)
+        return self.tags(target), result.stdout.decode()
+
+    def test_caf_to_aiff(self):
+        for comment, kept, said in ((b"white space behind \n", "white space behind", "white space around comments"),
+                                    (b"long" * 20000, None, "comments longlong"),
+                                    (b"J\xFCrgen", None, "no UTF-8")):
+            self.write("b.caf", caf((b"uuid", BASIC_UUID + pairs((b"genre", b"Rock"), (b"category", b"x" * 50))),
+                                    (b"info", pairs((b"comments", comment), (b"title", b"T")))))
+            shutil.copy(MEDIA / "tone-16.aiff", self.folder / "a.aiff")
+            self.run_command("tags", "remove", "a.aiff")
+            shown, text = self.copied("b.caf", "a.aiff")
+            self.assertEqual([shown.get(key) for key in ("genre", "title", "comments", "instrumentType")],
+                             ["Rock", "T", kept, None])
+            self.assertIn(said, text)
+            result = self.run_command("decode", "b.caf", "-o", "c.aif", "--force")
+            shown = self.tags("c.aif")
+            self.assertEqual([shown.get(key) for key in ("genre", "title", "comments")], ["Rock", "T", kept])
+            self.assertIn(said, result.stderr.decode())
+
+    def test_aiff_to_caf(self):
+        for chunk, said in (((b"COMT", comments(b"a\0b")), "NUL"), ((b"AUTH", b"J\xFCrgen"), "no UTF-8"),
+                            ((b"cate", category(b"R,B", genre=b"Rock", descriptors=(b"A,B", b"Dry"))),
+                             "descriptors A,B is not kept")):
+            shutil.copy(MEDIA / "tone-16.aiff", self.folder / "a.aiff")
+            self.run_command("tags", "remove", "a.aiff")
+            aiff_with(self.folder / "a.aiff", (b"NAME", b"T"), chunk)
+            self.write("b.caf", caf())
+            shown, text = self.copied("a.aiff", "b.caf")
+            self.assertEqual(shown.get("title"), "T")
+            self.assertIn(said, text)
+        self.assertEqual([shown.get(key) for key in ("genre", "descriptors", "instrumentType")], ["Rock", ["Dry"], None])
+
+    def test_between_files_of_one_kind_bytes_are_copied(self):
+        aiff_with(self.folder / "a.aiff", (b"AUTH", b"J\xFCrgen"), (b"cate", category(b"Dr\xFCms")))
+        shutil.copy(MEDIA / "tone-16.aiff", self.folder / "b.aiff")
+        self.run_command("tags", "copy", "a.aiff", "b.aiff")
+        for chunk_id in ("AUTH", "cate"):
+            self.assertEqual(*(self.run_command("chunks", "get", name, chunk_id).stdout for name in ("a.aiff", "b.aiff")))
+        entries = pairs((b"key signature", b"Cb"), (b"time signature", b"4/0"), (b"genre", b"R,B"))
+        self.write("a2.caf", caf((b"uuid", BASIC_UUID + entries)))
+        self.write("b2.caf", caf())
+        self.run_command("tags", "copy", "a2.caf", "b2.caf")
+        self.assertEqual(self.run_command("chunks", "get", "b2.caf", "uuid").stdout[-len(entries):], entries)
+
+    def test_fields_of_transients_are_copied(self):
+        head = struct.pack(">hhhHI15I", 2, 40, 3, 0, 77, *bytes(15))
+        aiff_with(self.folder / "a.aiff", (b"trns", head + struct.pack(">IHHI16x", 1, 1, 0, 7)))
+        self.set("a.caf", "transients=7")
+        self.run_command("tags", "copy", "a.aiff", "a.caf")
+        body = self.run_command("chunks", "get", "a.caf", "uuid").stdout
+        self.assertEqual(body[-32:], struct.pack(">IHHHHqHHQ", 0, 2, 0, 40, 3, 1, 1, 0, 7))
+        self.assertEqual(self.lines("tags", "copy", "a.aiff", "a.caf"), ["a.caf: unchanged"])
 
 
 class Outside(TagsTest):

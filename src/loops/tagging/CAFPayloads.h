@@ -17,8 +17,8 @@ using StringPairs = std::map<std::string, std::string>;
 
 /// Calls `visit` for each pair of such a payload that is there, whatever its count claims; a text ends at its NUL, or
 /// with the data. The texts may be anything but NUL.
-void ForEachCAFInfoString(BytesView payload,
-                          const std::function<void(std::string_view key, std::string_view value)>& visit);
+KT_EXPORT void ForEachCAFInfoString(BytesView payload,
+                                    const std::function<void(std::string_view key, std::string_view value)>& visit);
 } // namespace tagging
 
 // Each returns null when memory is short.

@@ -13,10 +13,15 @@ package = media / "Sketch.fuguex"
 shutil.rmtree(package, ignore_errors=True)
 
 
+def property_list(content):
+    """As the library writes it: without a DOCTYPE."""
+    return b"".join(line for line in plistlib.dumps(content).splitlines(keepends=True) if not line.startswith(b"<!DOCTYPE"))
+
+
 def write(name, content):
     path = package / name
     path.parent.mkdir(parents=True, exist_ok=True)
-    path.write_bytes(content if isinstance(content, bytes) else plistlib.dumps(content))
+    path.write_bytes(content if isinstance(content, bytes) else property_list(content))
     os.utime(path, (1763700000, 1763700000))
 
 

@@ -1,5 +1,5 @@
 // Published sources: Multimedia Programming Interface and Data Specifications 1.0, EBU Tech 3306 (RF64), AIFF 1.3 and
-// the AIFF-C draft of 1991-08-26, Core Audio Format specification 1.0.
+// the AIFF-C draft of 1991-08-26, the published format description of CAF, version 1.0.
 #include "audiofile/AudioFileHeader.h"
 
 #include "audiofile/BusFormats.h"

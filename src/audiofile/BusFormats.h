@@ -1,6 +1,6 @@
 // Which speakers the channels of a bus format feed. A speaker is a bit, as WAVE's channel mask and CAF's channel bitmap
-// number them (published: KSAUDIO_SPEAKER masks, Core Audio Format specification); channels stand in the order of the
-// bits.
+// number them (published: the extensible WAVE format; the format description of CAF, version 1.0); channels stand in
+// the order of the bits.
 #pragma once
 
 #include "audiofile/AudioFileInfo.h"

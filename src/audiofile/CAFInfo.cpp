@@ -1,4 +1,4 @@
-// CAF. Published source: Core Audio Format specification 1.0.
+// CAF. Published source: the published format description, version 1.0.
 #include "audiofile/BusFormats.h"
 #include "audiofile/ContainerDescriptions.h"
 #include "audiofile/ContainerWalk.h"

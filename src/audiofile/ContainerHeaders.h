@@ -98,7 +98,7 @@ struct KT_EXPORT ChkHeader {
 };
 static_assert(sizeof(ChkHeader) == 8);
 
-/// The 12 bytes ahead of each chunk of a CAF file, big-endian (published: Core Audio Format specification).
+/// The 12 bytes ahead of each chunk of a CAF file, big-endian (published format description, version 1.0).
 struct CAFChunkHeader {
     Packed<FourCC> id;         // 0
     Packed<std::int64_t> size; // 4  -1: to the end of the file, for the last chunk, "data"

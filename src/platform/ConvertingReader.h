@@ -82,7 +82,7 @@ public:
     /// channels. Places and counts of frames are then those of the client's rate. A rate other than before sets the
     /// place to 0.
     std::int32_t setClientFormat(const StreamDescription& format, Error* error = nullptr);
-    /// Which speakers the file's channels feed, as bits of WAVE's channel mask (KSAUDIO_SPEAKER), channels in their
+    /// Which speakers the file's channels feed, as bits of the channel mask of extensible WAVE, channels in their
     /// order. 0 when it does not say, and of linear PCM that the library reads itself (CAudioFileIO tells).
     std::uint32_t speakers() const;
     /// The file's frames, at its own rate.

@@ -1,4 +1,4 @@
-// Containers that list their packets: MP4, QuickTime and CAF, as programs write them and with what is changed in them.
+// Containers that list their packets: MP4, MOV and CAF, as programs write them and with what is changed in them.
 #include "packets/EncodedFiles.h"
 
 #include "platform/core/ByteWriter.h"
@@ -62,7 +62,7 @@ void addGaplessItem(Bytes& file, std::string_view value)
     };
     ByteWriter item;
     item.write(field("mean", 4, "com.example"));
-    item.write(field("name", 4, "iTunSMPB"));
+    item.write(field("name", 4, "testSMPB"));
     item.write(field("data", 8, value));
     ByteWriter meta;
     meta.writeZeros(4);

@@ -21,11 +21,12 @@ TEST(ContentType, AudioAndFLAC)
         }
     };
     expect({"org.xiph.flac", "audio/flac", "Audio/X-FLAC", "audio/flac; charset=binary"}, true, true);
-    expect({"public.audio", "public.aifc-audio", "com.microsoft.waveform-audio", "PUBLIC.MP3", "audio/vnd.wave;codec=1",
-            "audio/x-caf"}, // no identifier stands for the last
+    expect({"public.audio", "public.aifc-audio", "com.example.waveform-audio", "PUBLIC.MP3", "audio/vnd.wave;codec=1",
+            "com.example.someaudio-format", // as vendors call CAF
+            "audio/x-caf"},                 // no identifier stands for the last
            true, false);
     expect({"audio/", "audio", "public.movie", "video/mp4", "public.data", "public.audio2", "application/octet-stream",
-            ""},
+            "", "my-audio", "public.other-audio", "com.example.audio-format.list"},
            false, false);
     EXPECT_FALSE(ContentType(String()).conformsTo(ContentType::audio()));
 }

@@ -1,5 +1,5 @@
-// The overview chunk of CAF, "ovvw", made of an overview block, and blocks made of its pairs. Published source: Core
-// Audio Format specification 1.0. Page: docs/formats/overview.md.
+// The overview chunk of CAF, "ovvw", made of an overview block, and blocks made of its pairs. Published source: the
+// format description of CAF, version 1.0. Page: docs/formats/overview.md.
 #pragma once
 
 #include "loops/overview/OverviewBlock.h"

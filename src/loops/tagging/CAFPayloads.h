@@ -23,7 +23,7 @@ KT_EXPORT void ForEachCAFInfoString(BytesView payload,
 
 // Each returns null when memory is short.
 
-/// Payload of the CAF "info" chunk (published: Core Audio Format specification, Information chunk): a big-endian uint32
+/// Payload of the CAF "info" chunk (published format description, version 1.0, Information chunk): a big-endian uint32
 /// count, then key, NUL, value, NUL for each pair, in the dictionary's own order.
 KT_EXPORT std::optional<Bytes> CAFInfoStringsData(const tagging::StringPairs& strings);
 /// The basic tagging UUID, then the same count and pairs.

@@ -22,7 +22,7 @@ public:
     /// What read() gives: interleaved, packed linear PCM of a supported sample, at the file's rate and channel count.
     virtual const StreamDescription& frameFormat() const = 0;
     virtual std::uint64_t frameCount() const = 0;
-    /// Which speakers the channels feed, as bits of WAVE's channel mask (KSAUDIO_SPEAKER), channels in their order; 0
+    /// Which speakers the channels feed, as bits of the channel mask of extensible WAVE, channels in their order; 0
     /// when the file does not say.
     virtual std::uint32_t speakers() const { return 0; }
     /// False when the format has none.

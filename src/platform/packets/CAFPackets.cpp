@@ -21,7 +21,7 @@ std::uint64_t notNegative(std::int64_t number)
     return static_cast<std::uint64_t>(std::max<std::int64_t>(number, 0));
 }
 
-/// Takes off what QuickTime puts around the configuration of ALAC: an atom "frma", and the header of an atom "alac".
+/// Takes off what some writers put around the configuration of ALAC: an atom "frma", and the header of an atom "alac".
 void unwrapALAC(Bytes& cookie)
 {
     constexpr std::ptrdiff_t kWrapperSize = 12; // in both: size, type, and four bytes

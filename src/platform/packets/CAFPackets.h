@@ -1,4 +1,4 @@
-// The packets of a Core Audio Format file (Core Audio Format specification 1.0) that holds no linear PCM.
+// The packets of a CAF file (published format description, version 1.0) that holds no linear PCM.
 #pragma once
 
 #include "platform/audio/AudioDescription.h"

@@ -68,7 +68,7 @@ std::optional<GaplessItem> readGaplessItem(PacketFile& file, const MP4Box& movie
     MP4Boxes list(file, *items);
     while (const auto item = list.find(fourCC("----"))) {
         const BytesView name = bodyOf(file, MP4Boxes(file, *item).find(fourCC("name")), 64);
-        if (name.size() < kVersionSize || textOf(name.subspan(kVersionSize)) != "iTunSMPB")
+        if (!textOf(name).ends_with("SMPB"))
             continue;
         const BytesView data = bodyOf(file, MP4Boxes(file, *item).find(fourCC("data")), 256);
         std::array<std::uint64_t, 4> numbers{}; // 0, priming, remainder, valid frames, …

@@ -1,5 +1,5 @@
-// Which part of an MP4 file's frames is the sound: what its edit list says (ISO/IEC 14496-12, 8.6.6), and the item
-// "iTunSMPB" among its tags.
+// Which part of an MP4 file's frames is the sound: what its edit list says (ISO/IEC 14496-12, 8.6.6), and the gapless
+// value among its tags, whose name ends in "SMPB".
 #pragma once
 
 #include "platform/packets/MP4Boxes.h"

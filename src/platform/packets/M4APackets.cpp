@@ -113,7 +113,7 @@ std::int32_t M4APackets::findTrack(const MP4Box& movie, Track& track)
 /// Fills format and cookie from the first entry of "stsd".
 std::int32_t M4APackets::readSampleEntry(const MP4Box& descriptions)
 {
-    constexpr std::uint64_t kFieldsSize = 28; // and in QuickTime 16 more in version 1, 36 in version 2
+    constexpr std::uint64_t kFieldsSize = 28; // and in MOV 16 more in version 1, 36 in version 2
     MP4Box entry;
     if (!MP4Boxes(*file_, descriptions, 8).next(entry))
         return kStatusIOError;

@@ -1,4 +1,4 @@
-// The packets of the audio track in an MP4, M4A or QuickTime file (ISO/IEC 14496-12, -14).
+// The packets of the audio track in an MP4, M4A or MOV file (ISO/IEC 14496-12, -14).
 #pragma once
 
 #include "platform/packets/MP4Boxes.h"

@@ -1,4 +1,4 @@
-// The boxes that MP4 and QuickTime files are made of (ISO/IEC 14496-12, 4.2).
+// The boxes that MP4 and MOV files are made of (ISO/IEC 14496-12, 4.2).
 #pragma once
 
 #include "platform/core/FourCC.h"

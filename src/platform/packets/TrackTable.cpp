@@ -40,7 +40,7 @@ std::int32_t makePacketTable(std::uint64_t inPackets, std::uint64_t priming, std
 
 std::int32_t makePacketTable(const TrackFrames& frames, PacketTable& table)
 {
-    // "iTunSMPB" counts frames; an edit list counts units that may be coarser. Taken when it fits the packets.
+    // The gapless value counts frames; an edit list counts units that may be coarser. Taken when it fits the packets.
     if (const auto& item = frames.gapless) {
         const std::uint64_t around = std::uint64_t{item->priming} + item->remainder;
         const bool fits = item->validFrames <= frames.inPackets && around <= frames.inPackets - item->validFrames;

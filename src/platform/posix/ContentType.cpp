@@ -39,7 +39,7 @@ constexpr Conformance conformances[] = {
     {"public.audio", "public.audiovisual-content"},
     {"public.aiff-audio", "public.audio"},
     {"public.aifc-audio", "public.aiff-audio"},
-    {"com.microsoft.waveform-audio", "public.audio"},
+    {"public.waveform-audio", "public.audio"},
     {"public.mp2", "public.audio"},
     {"public.mp3", "public.audio"},
     {"public.mpeg-4-audio", "public.audio"},
@@ -62,10 +62,10 @@ struct MIMEName {
 constexpr MIMEName mimeNames[] = {
     {"audio/aiff", "public.aiff-audio"},
     {"audio/x-aiff", "public.aiff-audio"},
-    {"audio/wav", "com.microsoft.waveform-audio"},
-    {"audio/wave", "com.microsoft.waveform-audio"},
-    {"audio/x-wav", "com.microsoft.waveform-audio"},
-    {"audio/vnd.wave", "com.microsoft.waveform-audio"},
+    {"audio/wav", "public.waveform-audio"},
+    {"audio/wave", "public.waveform-audio"},
+    {"audio/x-wav", "public.waveform-audio"},
+    {"audio/vnd.wave", "public.waveform-audio"},
     {"audio/mpeg", "public.mp3"},
     {"audio/mp3", "public.mp3"},
     {"audio/mp4", "public.mpeg-4-audio"},
@@ -97,7 +97,15 @@ constexpr MIMEName mimeNames[] = {
     {"inode/directory", "public.folder"},
 };
 
-/// A type of the table, or a MIME type of a family; `base` is empty when the type is unknown.
+/// Whether the last part of a vendor's own identifier says that it is audio: "com.example.wave-audio",
+/// "com.example.audio-format".
+bool saysAudio(std::string_view identifier)
+{
+    return identifier.find('.') != identifier.npos && !identifier.starts_with("public.") &&
+           (identifier.ends_with("-audio") || identifier.ends_with("audio-format"));
+}
+
+/// A type of the table, a MIME type of a family, or a vendor's; `base` is empty when the type is unknown.
 struct Resolved {
     std::string name;      // tells types apart
     std::string_view base; // in the table: the type itself, or what its family stands for
@@ -112,7 +120,9 @@ Resolved resolve(const String& identifier)
     if (name.find('/') == name.npos) {
         const auto* known = std::find_if(std::begin(conformances), std::end(conformances),
                                          [&](const Conformance& entry) { return entry.type == name; });
-        return {name, known == std::end(conformances) ? std::string_view() : known->type};
+        if (known != std::end(conformances))
+            return {name, known->type};
+        return {name, saysAudio(name) ? std::string_view("public.audio") : std::string_view()};
     }
     name.erase(std::min(name.find_first_of("; \t"), name.size()));
     for (const MIMEName& mime : mimeNames) {

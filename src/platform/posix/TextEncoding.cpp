@@ -10,7 +10,7 @@ namespace platform {
 
 namespace {
 
-/// The upper half of the Western encoding, 0x80 to 0xFF (charset "macintosh" of RFC 1345, with the euro sign at 0xDB).
+/// The upper half of the Western encoding, 0x80 to 0xFF (a charset of RFC 1345, with the euro sign at 0xDB).
 constexpr char16_t kWestern[] = u"ÄÅÇÉÑÖÜáàâäãåçéèêëíìîïñóòôöõúùûü"
                                 u"†°¢£§•¶ß®©™´¨≠ÆØ∞±≤≥¥µ∂∑∏π∫ªºΩæø"
                                 u"¿¡¬√ƒ≈∆«»…\u00A0ÀÃÕŒœ–—“”‘’÷◊ÿŸ⁄€‹›ﬁﬂ"

@@ -4,11 +4,11 @@
 #include "files/AudioFileNames.h"
 #include "files/CFileUtilDates.h"
 
-#include <algorithm>
 #include <array>
-#include <cctype>
 #include <cmath>
 #include <ctime>
+#include <vector>
+
 #include <sys/stat.h>
 
 namespace {
@@ -33,10 +33,21 @@ bool isFile(const std::string& path)
     return ::stat(path.c_str(), &status) == 0 && S_ISREG(status.st_mode);
 }
 
-std::string changed(std::string text, int (*change)(int))
+/// The ways to spell a short text in upper and lower case, as it is given first.
+std::vector<std::string> spellings(const std::string& text)
 {
-    std::transform(text.begin(), text.end(), text.begin(), [change](char c) { return static_cast<char>(change(c)); });
-    return text;
+    std::vector<std::string> all{text};
+    for (std::size_t at = 0; at < text.size(); ++at) {
+        const bool isUpper = text[at] >= 'A' && text[at] <= 'Z', isLower = text[at] >= 'a' && text[at] <= 'z';
+        if (!isUpper && !isLower)
+            continue;
+        for (std::size_t i = 0, count = all.size(); i < count; ++i) {
+            std::string other = all[i];
+            other[at] = static_cast<char>(text[at] ^ 'a' ^ 'A');
+            all.push_back(std::move(other));
+        }
+    }
+    return all;
 }
 
 } // namespace
@@ -53,8 +64,8 @@ std::optional<StereoHalf> stereoHalf(const std::string& path)
     const std::string stem = path.substr(0, name + static_cast<std::size_t>(point));
     const std::string suffix = CFileUtilGetStereoExtension(nullptr, index ^ 1);
     half.partner = stem + suffix;
-    // Some systems write names in capitals, or all small.
-    for (const std::string& candidate : {suffix, changed(suffix, ::toupper), changed(suffix, ::tolower)})
+    // Programs write names in capitals, small, or in between.
+    for (const std::string& candidate : spellings(suffix))
         if (isFile(stem + candidate)) {
             half.partner = stem + candidate;
             half.partnerExists = true;

@@ -75,10 +75,10 @@ std::int32_t CAuFileIO::ReadSamples(float* dest, std::int64_t startFrame, std::i
 
 std::int32_t CAuFileIO::ReadFloat(float* dest, long startFrame, long& frames)
 {
-    if (dest == nullptr || startFrame < 0 || frames < 0)
+    if (dest == nullptr || frames < 0)
         return kStatusParameterError;
     std::int64_t read = frames;
-    const std::int32_t status = ReadSamples(dest, startFrame, read);
+    const std::int32_t status = startFrame < 0 ? kStatusParameterError : ReadSamples(dest, startFrame, read);
     if (status == kStatusOK)
         frames = static_cast<long>(read);
     else

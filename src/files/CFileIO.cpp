@@ -133,7 +133,7 @@ std::int32_t CFileIO::Write(const void* buffer, long count)
 {
     if (count < 0 || (buffer == nullptr && count > 0))
         return kStatusParameterError;
-    if (mWriteCache && count <= mWriteCacheCapacity - Pending()) {
+    if (count <= mWriteCacheCapacity - Pending()) {
         std::copy_n(static_cast<const char*>(buffer), count, mWriteCacheFill);
         mWriteCacheFill += count;
         return kStatusOK;
@@ -152,6 +152,7 @@ std::int32_t CFileIO::WriteThrough(const void* buffer, long long position, long 
     if (IsMemoryFile())
         return WriteToMemory(buffer, position, count);
     mCacheLength = 0;
+    HintAtNoReuse(std::min(position, kWorthAHint) + count);
     for (long written = 0; written < count;) {
         const long piece = std::min(count - written, kLargestPiece);
         const std::int64_t put =
@@ -166,21 +167,31 @@ std::int32_t CFileIO::WriteThrough(const void* buffer, long long position, long 
     return kStatusOK;
 }
 
+/// Tells the system, once, that the bytes of a file so long will not be wanted again soon.
+void CFileIO::HintAtNoReuse(long long length)
+{
+    if (mIsHinted || length < kWorthAHint)
+        return;
+    mIsHinted = true;
+    platform::systemCalls().adviseNoReuse(mDescriptor);
+}
+
+/// Kept: growing goes by way of SetEOF, so that a mark beyond the new end moves there, and nothing written beyond the
+/// end makes the file that long.
 std::int32_t CFileIO::WriteToMemory(const void* buffer, long long position, long count)
 {
-    if (count == 0)
-        return kStatusOK;
     if (position < 0)
         return kStatusParameterError;
     long long end = 0;
     if (__builtin_add_overflow(position, count, &end))
         return kStatusFileTooBig;
     if (!mCache || end > static_cast<long long>(mCache->size())) {
-        const std::int32_t status = ResizeMemory(end);
+        const std::int32_t status = SetEOF(end);
         if (status != kStatusOK)
             return status;
     }
-    std::memcpy(mCache->data() + position, buffer, static_cast<std::size_t>(count));
+    if (count > 0)
+        std::memcpy(mCache->data() + position, buffer, static_cast<std::size_t>(count));
     return kStatusOK;
 }
 
@@ -222,6 +233,7 @@ std::int32_t CFileIO::SetEOF(long long length)
             return status;
     } else {
         mCacheLength = 0; // it may hold bytes that are cut off
+        HintAtNoReuse(length);
         while (platform::systemCalls().ftruncate(mDescriptor, length) != 0) {
             if (errno != EINTR)
                 return PosixErrorToOSErr();
@@ -246,7 +258,9 @@ std::int32_t CFileIO::ResizeMemory(long long length)
 std::int32_t CFileIO::Allocate(long long length, bool preallocate)
 {
     long long end = 0;
-    if (preallocate && !IsMemoryFile() && GetEOF(&end) == kStatusOK)
-        platform::systemCalls().preallocate(mDescriptor, end, length); // the space may as well come later
-    return SetEOF(length);
+    const bool isReserved = preallocate && !IsMemoryFile() && GetEOF(&end) == kStatusOK &&
+                            platform::systemCalls().preallocate(mDescriptor, end, length) == 0;
+    const std::int32_t status = SetEOF(length);
+    // As much as the file held before is reserved beyond its new end; to be set to the length it has gives that back.
+    return status == kStatusOK && isReserved && end > 0 ? SetEOF(length) : status;
 }

@@ -73,6 +73,7 @@ public:
     /// Cuts the file or extends it with zeros; a mark beyond `length` moves there.
     std::int32_t SetEOF(long long length);
     /// SetEOF, with `preallocate` after asking for `length` bytes of space behind the end of the file, which may fail.
+    /// What is left of that beyond `length` is given back.
     std::int32_t Allocate(long long length, bool preallocate);
     /// Moves everything from `from` (at most the length) to the end of the file so that it begins at `to`; the length
     /// changes by the distance. kStatusNotOpen without write access.
@@ -105,6 +106,7 @@ private:
     std::int32_t OpenFile(const CFileRef& ref, unsigned int mode);
     std::int32_t OpenStepByStep(const CFileRef& ref, unsigned int mode);
     void Adopt(int descriptor, long long length, unsigned int mode);
+    void HintAtNoReuse(long long length);
     std::int32_t CloseDescriptor();
     void ForgetPosition();
 
@@ -121,6 +123,8 @@ private:
     void AdoptWriteCache(std::unique_ptr<char[]> buffer, long long size);
     long long Pending() const { return mWriteCacheFill - mWriteCache.get(); }
 
+    static constexpr long long kWorthAHint = 1 << 20; // what is smaller crowds nothing out of the system's cache
+
     std::int32_t mDescriptor = -1;
     long long mCacheOffset = 0;
     long long mCacheLength = 0; // valid bytes; of a memory file, its length
@@ -131,4 +135,5 @@ private:
     long long mWriteCacheCapacity = 0;
     unsigned int mMode = 0;
     long long mLengthAtOpen = 0;
+    bool mIsHinted = false; // of the open file
 };

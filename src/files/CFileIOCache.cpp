@@ -18,13 +18,13 @@ long CFileIO::CopyFromCache(void* buffer, long long position, long count) const
 }
 
 /// Fills the cache from a position; false, and the cache empty, when not even `needed` bytes came. A block that reaches
-/// beyond the end of the file holds what there is.
+/// beyond the end of the file holds what there is. A request that the block cannot hold leaves it as it is.
 bool CFileIO::Refill(long long position, long needed)
 {
     const auto size = static_cast<long>(mCache->size());
-    mCacheLength = 0;
     if (needed > size)
         return false;
+    mCacheLength = 0;
     long filled = 0;
     if (ReadDirect(mCache->data(), position, size, needed, &filled) != kStatusOK)
         return false;

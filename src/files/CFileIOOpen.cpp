@@ -6,6 +6,7 @@
 #include "platform/SystemCalls.h"
 
 #include <array>
+#include <string_view>
 
 namespace {
 
@@ -21,6 +22,17 @@ bool IsAliasFile(int descriptor, const platform::FileStatus& status)
     std::array<std::byte, 64> start;
     const std::int64_t got = platform::systemCalls().pread(descriptor, start.data(), start.size(), 0);
     return got > 0 && platform::looksLikeBookmark(BytesView(start).first(static_cast<std::size_t>(got)));
+}
+
+/// Whether "." or ".." is a component of the path: what it leads to has another path then.
+bool HasDots(std::string_view path)
+{
+    for (std::size_t at = path.find("/."); at != path.npos; at = path.find("/.", at + 1)) {
+        const std::string_view behind = path.substr(at + 2, 2);
+        if (behind.empty() || behind[0] == '/' || behind == "." || behind == "./")
+            return true;
+    }
+    return false;
 }
 
 platform::OpenFor AccessOf(unsigned int mode)
@@ -75,12 +87,12 @@ std::int32_t CFileIO::Open(const CFileRef& ref, unsigned int mode)
     return status;
 }
 
-/// Opening a path without links proves at once that there is nothing to resolve, that the file exists and that it is no
-/// folder. Whatever else comes of it is looked at step by step.
+/// Opening a path without links or dots proves at once that there is nothing to resolve, that the file exists and that
+/// it is no folder. Whatever else comes of it is looked at step by step.
 std::int32_t CFileIO::OpenFile(const CFileRef& ref, unsigned int mode)
 {
     const platform::SystemCalls& system = platform::systemCalls();
-    if (const char* path = ref.GetPath()) {
+    if (const char* path = ref.GetPath(); path != nullptr && !HasDots(path)) {
         platform::FileStatus status;
         const int descriptor = system.openFileWithoutLinks(path, AccessOf(mode), &status);
         if (descriptor >= 0) {
@@ -125,9 +137,7 @@ void CFileIO::Adopt(int descriptor, long long length, unsigned int mode)
     mDescriptor = descriptor;
     mLengthAtOpen = length;
     mMode = mode;
-    constexpr long long worthAHint = 1 << 20; // what is smaller crowds nothing out of the system's cache
-    if (length >= worthAHint)
-        platform::systemCalls().adviseNoReuse(descriptor);
+    HintAtNoReuse(length);
 }
 
 std::int32_t CFileIO::Close()
@@ -149,6 +159,7 @@ std::int32_t CFileIO::CloseDescriptor()
     mDescriptor = -1;
     mMode = 0;
     mLengthAtOpen = 0;
+    mIsHinted = false;
     return status;
 }
 

@@ -86,7 +86,8 @@ public:
     bool ReplaceName(const char* name, bool isDirectory);
     bool ReplaceName(const platform::String& name, bool isDirectory);
     bool ReplaceName(const CFileRef& other);
-    /// With or without a leading dot; empty removes the extension. The result denotes a file.
+    /// With or without a leading dot; empty removes the extension. The result denotes a file. Fails when the new name
+    /// would have 1,024 bytes or more.
     bool ReplaceExtensionBy(const std::string& ext);
 
     bool IsValid() const { return mValid; }

@@ -135,7 +135,8 @@ bool CFileRef::ReplaceExtensionBy(const std::string& ext)
         name.resize(dot);
     if (!replacement.empty())
         (name += '.') += replacement;
-    return ReplaceName(String::fromUTF8(name), false);
+    // A name that GetFileName cannot give has no extension either.
+    return name.size() < kNameBufferSize ? ReplaceName(String::fromUTF8(name), false) : Set(URLRef());
 }
 
 String CFileRef::CopyFileName() const

@@ -1,6 +1,7 @@
 // What the file system knows of a reference's item, and the comparison of references.
 #include "files/CFileRef.h"
 
+#include "files/CFileUtilLocations.h"
 #include "platform/core/ASCIICase.h"
 
 #include <cstdio>
@@ -74,7 +75,10 @@ bool CFileRef::IsRoot() const
     FileStatus above;
     if (!parent.SetToParent() || !linkStatusOf(*this, own) || !linkStatusOf(parent, above))
         return false;
-    return own.device != above.device || own.inode == above.inode;
+    if (own.device == above.device)
+        return own.inode == above.inode;
+    // The files of an overlay have other devices than their folders, on one mount.
+    return own.kind == FileKind::directory || !CFileUtilItemsOnSameVolume(*this, parent);
 }
 
 bool CFileRef::Exists() const

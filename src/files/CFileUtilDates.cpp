@@ -46,9 +46,10 @@ std::int32_t setDate(const CFileRef& file, FileDate date, double seconds)
     if (path == nullptr || !(std::abs(seconds) <= farthest))
         return kStatusParameterError;
     const double whole = std::floor(seconds);
-    // Rounded down: a date must not come out later than it is, least of all in the next second.
-    const FileTime time{static_cast<std::int64_t>(whole) + k2001,
-                        static_cast<std::uint32_t>((seconds - whole) * kNanosecondsPerSecond)};
+    FileTime time{static_cast<std::int64_t>(whole) + k2001,
+                  static_cast<std::uint32_t>(std::lround((seconds - whole) * kNanosecondsPerSecond))};
+    if (time.nanoseconds == kNanosecondsPerSecond)
+        time = {time.seconds + 1, 0};
     return platform::setFileDate(path, date, time) ? kStatusOK : PosixErrorToOSErr();
 }
 

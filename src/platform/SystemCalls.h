@@ -24,11 +24,12 @@ enum class OpenFor { reading, readingAndWriting };
 /// lengths are in bytes.
 struct SystemCalls {
     /// Opens a regular file, with its status unless `status` is null, and nothing else: a directory fails with EISDIR;
-    /// a FIFO, socket or device with ENXIO, and never by waiting. Descriptors are not inherited by other programs.
+    /// a FIFO, socket or device with ENXIO, and never by waiting. A file on which another process holds a lease is
+    /// waited for. Descriptors are not inherited by other programs.
     int (*openFile)(const char* path, OpenFor access, FileStatus* status);
     /// As openFile, but fails with ELOOP when any component of the path is a symbolic link, and with ENOSYS where the
-    /// system cannot tell. Two calls when it succeeds for reading: what is not a regular file may have been opened,
-    /// without waiting for it, and closed again; devices below "/dev" are not.
+    /// system cannot tell. Two calls when it succeeds for reading what is named like a recording; a FIFO by such a name
+    /// is opened, without waiting for it, and closed again. Of any other name it looks first.
     int (*openFileWithoutLinks)(const char* path, OpenFor access, FileStatus* status);
     /// O_CREAT | O_EXCL, for writing; the permissions are those given less the process's mask.
     int (*createFile)(const char* path, std::uint32_t permissions);

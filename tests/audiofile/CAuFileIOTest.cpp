@@ -126,8 +126,11 @@ TEST(CAuFileIO, ARangeThatCannotBeReadIsZero)
     EXPECT_EQ(file.ReadFloat(samples.data(), 40000, frames), kStatusEndOfFile);
     EXPECT_TRUE(isZeroed(10));
     EXPECT_EQ(frames, 10);
-    for (const long start : {-1L, LONG_MIN})
+    for (const long start : {-1L, LONG_MIN}) {
+        samples.assign(samples.size(), 7);
         EXPECT_EQ(file.ReadFloat(samples.data(), start, frames), kStatusParameterError);
+        EXPECT_TRUE(isZeroed(10)) << start;
+    }
     EXPECT_EQ(file.ReadFloat(nullptr, 0, frames), kStatusParameterError);
     file.Close();
     samples.assign(samples.size(), 7);

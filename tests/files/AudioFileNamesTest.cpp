@@ -63,6 +63,21 @@ TEST(StereoNames, TheSuffixIsFoundAndCut)
     EXPECT_EQ(CFileUtilHasStereoExtension(nullptr, 7), -1);
 }
 
+TEST(StereoNames, SuffixesByTheirIndex)
+{
+    char out[8] = "before";
+    for (const auto& [index, suffix] : {std::pair{3, ".air"}, {0, ".L.aif"}, {21, ".R.m4a"}, {4, ""}}) {
+        EXPECT_STREQ(CFileUtilGetStereoExtension(out, index), suffix);
+        EXPECT_STREQ(out, suffix);
+        EXPECT_STREQ(CFileUtilGetStereoExtension(nullptr, index), suffix);
+    }
+    for (const int index : {-1, kStereoSuffixes, 1000}) {
+        std::strcpy(out, "before");
+        EXPECT_EQ(CFileUtilGetStereoExtension(out, index), nullptr);
+        EXPECT_STREQ(out, "");
+    }
+}
+
 TEST(StereoNames, ThePartnerHasTheOtherSuffixOfTheRow)
 {
     const std::pair<const char*, const char*> pairs[] = {
@@ -123,6 +138,9 @@ TEST(Extensions, AreEnsuredSetAndAppended)
         {Do::append, "ab", "aupreset", 8, ".aupres"},
         {Do::append, "ab", "aupreset", 2, "."},
         {Do::append, "ab", "wav", 1, ""},
+        {Do::append, "abcdefghij", "wav", 8, "abc.wav"}, // a name that fills its buffer
+        {Do::ensure, "abc.wav", "wav", 8, "abc.wav", false},
+        {Do::ensure, "abcd.wav", "wav", 8, "abc.wav"}, // cut off by its buffer, "abcd.wa" ends otherwise
         {Do::append, "ab", "wav", 0, nullptr},
     };
     for (const Case& each : cases) {
@@ -166,4 +184,12 @@ TEST(Extensions, AreCut)
         EXPECT_STREQ(name, each.result != nullptr ? each.result : each.name);
     }
     EXPECT_FALSE(CFileUtilCutExtension(nullptr, nullptr));
+}
+
+TEST(Extensions, OfANameWithoutAnEndGetOne)
+{
+    char name[] = {'a', 'b', 'c', 'd', 'e', 'f', 'g', 'h', '#'};
+    CFileUtilSetNewExtension(name, "wav", 8);
+    EXPECT_STREQ(name, "abc.wav");
+    EXPECT_EQ(name[8], '#');
 }

@@ -14,8 +14,12 @@
 #include <unistd.h>
 
 #include <algorithm>
+#include <atomic>
+#include <chrono>
+#include <csignal>
 #include <filesystem>
 #include <random>
+#include <thread>
 
 namespace fs = std::filesystem;
 
@@ -275,4 +279,189 @@ TEST_F(CFileIOTest, BlockMoveStopsAtTheFirstFailure)
     faults.fail(Call::pread, EIO);
     EXPECT_EQ(io.BlockMove(10, 0), kStatusIOError);
     EXPECT_EQ(io.GetEOF(), static_cast<long long>(3 * kMiB + 10)); // not cut
+}
+
+TEST_F(CFileIOTest, WhatIsMissingOrNegativeMovesNothing)
+{
+    CFileIO io(fileOf(pattern(100)), 1);
+    io.SetMark(40);
+    void* data = nullptr;
+    long size = 0;
+    char byte = 0;
+    EXPECT_EQ(io.Read(static_cast<void**>(nullptr), &size), kStatusParameterError);
+    EXPECT_EQ(io.Read(&data, nullptr), kStatusParameterError);
+    EXPECT_EQ(io.Read(&byte, static_cast<long*>(nullptr)), kStatusParameterError);
+    EXPECT_EQ(io.Read(&byte, -1L), kStatusParameterError);
+    for (const int cache : {0, 64}) {
+        io.SetWCache(cache);
+        EXPECT_EQ(io.Write(nullptr, 1), kStatusParameterError);
+        EXPECT_EQ(io.Write(&byte, -1), kStatusParameterError);
+        EXPECT_EQ(io.Write(nullptr, 0, 1), kStatusParameterError);
+        EXPECT_EQ(io.Write(nullptr, 0), kStatusOK);
+        EXPECT_EQ(io.GetMark(), 40);
+    }
+    EXPECT_EQ(io.UnRead(30), kStatusOK);
+    EXPECT_EQ(io.GetMark(), 10);
+    EXPECT_EQ(io.UnRead(11), kStatusBeforeStart);
+    EXPECT_EQ(io.GetMark(), 0);
+    EXPECT_EQ(readFile(io.GetPath()), pattern(100));
+    EXPECT_EQ(io.Read(&data, &size), kStatusOK);
+    EXPECT_EQ(size, 100);
+    EXPECT_EQ(io.GetMark(), 100);
+    std::free(data);
+}
+
+TEST_F(CFileIOTest, CRCIsThatOfAllBytesFromTheMark)
+{
+    for (const std::size_t size : {0U, 1U, 10240U, 30000U}) {
+        const Bytes content = pattern(size);
+        const auto length = static_cast<long long>(size);
+        CFileIO io(fileOf(content), 0);
+        EXPECT_EQ(io.CRC(), ECCRC32(0, content.data(), size)) << size;
+        EXPECT_EQ(io.GetMark(), length);
+        EXPECT_EQ(io.CRC(), size == 0 ? 0 : 0xFFFFFFFF); // the mark is at the end
+    }
+}
+
+TEST_F(CFileIOTest, ARequestBeyondTheCacheLeavesItAsItIs)
+{
+    const Bytes content = pattern(1000);
+    CFileIO io(fileOf(content), 0);
+    io.SetCache(100);
+    Bytes buffer(1000);
+    ASSERT_EQ(io.Read(buffer.data(), 50, 10, nullptr), kStatusOK);
+    FaultInjector faults;
+    ASSERT_EQ(io.Read(buffer.data(), 500, 400, nullptr), kStatusOK);
+    EXPECT_EQ(faults.calls(Call::pread), 1);
+    ASSERT_EQ(io.Read(buffer.data(), 149, 1, nullptr), kStatusOK);
+    EXPECT_EQ(faults.calls(Call::pread), 1);
+    EXPECT_EQ(buffer[0], content[149]);
+}
+
+TEST_F(CFileIOTest, MemoryFilesGrowByTheirMarkAndTakeABlockForContent)
+{
+    CFileIO io(CFileRef::None, 0x8001);
+    // Growing sets the length, which brings a mark beyond it back.
+    io.SetMark(100);
+    EXPECT_EQ(io.Write("x", 10, 1), kStatusOK);
+    EXPECT_EQ(io.GetEOF(), 11);
+    EXPECT_EQ(io.GetMark(), 11);
+    EXPECT_EQ(io.Write(nullptr, 20, 0), kStatusOK); // nothing, as far as there
+    EXPECT_EQ(io.GetEOF(), 20);
+    io.SetMark(30);
+    EXPECT_EQ(io.Write("y", 1), kStatusOK);
+    EXPECT_EQ(io.GetEOF(), 31);
+    EXPECT_EQ(io.GetMark(), 31);
+
+    EXPECT_EQ(io.SetCache(5), kStatusOK);
+    EXPECT_EQ(io.GetEOF(), 5);
+    char zeros[5] = {1, 1, 1, 1, 1};
+    EXPECT_EQ(io.Read(zeros, 0, 5, nullptr), kStatusOK);
+    EXPECT_EQ(std::count(zeros, zeros + 5, 0), 5);
+    EXPECT_EQ(io.Read(zeros, 0, 6, nullptr), kStatusEndOfFile);
+    EXPECT_EQ(io.SetCache(-1), kStatusParameterError);
+    EXPECT_EQ(io.GetEOF(), 5);
+}
+
+TEST_F(CFileIOTest, TheSystemIsToldOnceThatALargeFileIsNotWantedAgain)
+{
+    static int hints;
+    SystemCallGuard guard;
+    platform::systemCalls().adviseNoReuse = [](int) { return ++hints, 0; };
+    const CFileRef file = fileOf(Bytes());
+    const struct {
+        void (*grow)(CFileIO& io);
+        int hints;
+    } cases[] = {
+        {[](CFileIO& io) { io.Write("x", kMiB - 2, 1); }, 0},
+        {[](CFileIO& io) { io.Write("x", kMiB - 1, 1), io.Write("x", kHuge - 2, 1); }, 1},
+        {[](CFileIO& io) { io.SetEOF(kMiB - 1); }, 0},
+        {[](CFileIO& io) { io.SetEOF(kMiB), io.SetEOF(2 * kMiB); }, 1},
+        {[](CFileIO& io) { io.SetEOF(kMiB), io.Open(CFileRef(io), 1); }, 2},
+    };
+    for (const auto& c : cases) {
+        fs::resize_file(file.GetPath(), 0);
+        CFileIO io(file, 1);
+        hints = 0;
+        c.grow(io);
+        EXPECT_EQ(hints, c.hints) << "case " << &c - cases;
+    }
+}
+
+TEST_F(CFileIOTest, AllocatingKeepsNoSpaceBehindTheEnd)
+{
+    CFileIO io(fileOf(pattern(kMiB)), 1);
+    ASSERT_EQ(io.Allocate(3 * kMiB, true), kStatusOK);
+    EXPECT_EQ(io.GetEOF(), static_cast<long long>(3 * kMiB));
+    struct stat status = {};
+    ASSERT_EQ(stat(io.GetPath(), &status), 0);
+    EXPECT_LE(static_cast<std::size_t>(status.st_blocks) * 512, 3 * kMiB + 65536);
+}
+
+// Opened at once or step by step, the base holds the path of the file itself.
+TEST_F(CFileIOTest, DotsInAPathAreResolved)
+{
+    fs::create_directories(folder / "sub/.hidden");
+    const std::string target = folder.write("file", "x");
+    const std::string hidden = folder.write("sub/.hidden/..x", "x");
+    const std::pair<std::string, std::string> cases[] = {
+        {folder / "sub/../file", target},
+        {folder / "./file", target},
+        {folder / "sub/.hidden/../../file", target},
+        {folder / "sub/.hidden/..x", hidden},
+    };
+    for (const auto& [path, expected] : cases) {
+        CFileIO io(fileRef(path), 0);
+        EXPECT_STREQ(io.GetPath(), expected.c_str()) << path;
+    }
+}
+
+// A file server holds leases on what its clients use. Who opens such a file waits until the lease is given back.
+TEST_F(CFileIOTest, AFileUnderALeaseIsWaitedFor)
+{
+    const CFileRef file = fileOf(pattern(10));
+    fs::create_symlink("file", folder / "link");
+    const auto before = std::signal(SIGIO, SIG_IGN); // what the holder is sent
+    for (const CFileRef& ref : {file, fileRef(folder / "link")})
+        for (const unsigned int mode : {0U, 1U}) {
+            const int holder = open(file.GetPath(), O_RDONLY | O_CLOEXEC);
+            if (fcntl(holder, F_SETLEASE, mode == 0 ? F_WRLCK : F_RDLCK) != 0) {
+                close(holder);
+                std::signal(SIGIO, before);
+                GTEST_SKIP() << "no leases here";
+            }
+            std::atomic<bool> isOpen = false;
+            std::int32_t status = 1;
+            std::thread opener([&] {
+                CFileIO io;
+                status = io.Open(ref, mode);
+                isOpen = true;
+            });
+            std::this_thread::sleep_for(std::chrono::milliseconds(50));
+            EXPECT_FALSE(isOpen);
+            EXPECT_EQ(fcntl(holder, F_SETLEASE, F_UNLCK), 0);
+            opener.join();
+            EXPECT_EQ(status, kStatusOK) << "mode " << mode;
+            close(holder);
+        }
+    std::signal(SIGIO, before);
+}
+
+// To open a FIFO lets go whoever waits to write into it; the close that follows would kill that process.
+TEST_F(CFileIOTest, TheWriterOfAFIFOIsLeftWaiting)
+{
+    const std::string path = folder / "fifo.mp3";
+    ASSERT_EQ(mkfifo(path.c_str(), 0600), 0);
+    std::atomic<bool> isOpen = false;
+    std::thread writer([&] {
+        close(open(path.c_str(), O_WRONLY | O_CLOEXEC));
+        isOpen = true;
+    });
+    std::this_thread::sleep_for(std::chrono::milliseconds(20)); // until it waits
+    CFileIO io;
+    EXPECT_EQ(io.Open(fileRef(path), 0), kStatusNotAFile);
+    std::this_thread::sleep_for(std::chrono::milliseconds(20));
+    EXPECT_FALSE(isOpen);
+    close(open(path.c_str(), O_RDWR | O_CLOEXEC));
+    writer.join();
 }

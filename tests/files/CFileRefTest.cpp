@@ -1,4 +1,5 @@
 #include "files/CFileRef.h"
+#include "files/CFileUtilLocations.h"
 #include "platform/PropertyList.h"
 #include "support/FaultInjection.h"
 #include "support/References.h"
@@ -151,6 +152,46 @@ TEST(CFileRef, ExtensionsFollowTheLastDot)
         EXPECT_EQ(ref.ReplaceExtensionBy(""), *c.removed != '\0');
         EXPECT_EQ(shown(ref), c.removed);
     }
+}
+
+// What the operation calls done is there to be asked for, up to the longest name that a reference gives.
+TEST(CFileRef, ReplacedExtensionsFitTheName)
+{
+    for (const std::size_t length : {1019U, 1020U, 1023U}) {
+        CFileRef ref = file("/" + std::string(length, 'x'));
+        EXPECT_EQ(ref.ReplaceExtensionBy("wav"), length == 1019) << length;
+        EXPECT_EQ(ref.HasExtension("wav"), length == 1019);
+        EXPECT_EQ(ref.IsValid(), length == 1019);
+    }
+}
+
+TEST(CFileRef, TheLastComponentOfAnotherIsAdded)
+{
+    CFileRef ref = directory("/Music");
+    EXPECT_TRUE(ref.AddToPath(directory("/other/Loops")));
+    EXPECT_EQ(shown(ref), "/Music/Loops/");
+    EXPECT_TRUE(ref.AddToPath(file("/elsewhere/one.wav")));
+    EXPECT_EQ(shown(ref), "/Music/Loops/one.wav");
+}
+
+// On an overlay a file has another device than its folder, though nothing is mounted on it.
+TEST(CFileRef, TheFilesOfAnOverlayAreNoRoots)
+{
+    const TemporaryFolder folder;
+    const CFileRef plain = file(folder.write("file", ""));
+    folder.write(".hidden", "file\n");
+    const SystemCallGuard guard;
+    static decltype(platform::SystemCalls::linkStatus) real;
+    real = guard.real().linkStatus;
+    platform::systemCalls().linkStatus = [](const char* path, platform::FileStatus* status) {
+        const bool found = real(path, status);
+        status->device += status->kind == platform::FileKind::directory ? 0 : 1'000'000;
+        return found;
+    };
+    EXPECT_FALSE(plain.IsRoot());
+    EXPECT_STRNE(plain.GetMountPoint().GetPath(), plain.GetPath());
+    EXPECT_TRUE(CFileUtilIsHiddenOrInHiddenFolder(plain));
+    EXPECT_TRUE(directory("/proc").IsRoot());
 }
 
 TEST(CFileRef, QueriesAskTheFileSystem)

@@ -63,6 +63,36 @@ TEST(Dates, TheModificationDateBothWays)
     EXPECT_EQ(CFileUtilUTCModDate(CFileRef((folder / "link").c_str(), false)), 10);
 }
 
+// To the nanosecond, as far as a number holds it: what was read and set again is the same.
+TEST(Dates, WhatWasReadIsSetAgain)
+{
+    const TemporaryFolder folder;
+    const std::string path = folder.write("file", "x");
+    const CFileRef file(path.c_str(), false);
+    using platform::FileDate;
+    for (const std::uint32_t nanoseconds : {1U, 3U, 7U, 999'999'999U, 123'456'789U, 500'000'001U})
+        for (const std::int64_t seconds : {978'307'200LL, 978'307'210LL, 978'307'199LL}) { // about the start of 2001
+            const platform::FileTime time{seconds, nanoseconds};
+            ASSERT_TRUE(platform::setFileDate(path.c_str(), FileDate::modification, time));
+            EXPECT_EQ(CFileUtilSetUTCModDate(file, CFileUtilUTCModDate(file)), 0);
+            EXPECT_EQ(platform::fileDate(path.c_str(), FileDate::modification), time) << seconds << "." << nanoseconds;
+        }
+    EXPECT_EQ(CFileUtilSetUTCModDate(file, 0.9999999999), 0); // the nearest is the next second
+    EXPECT_EQ(CFileUtilUTCModDate(file), 1.0);
+}
+
+TEST(Dates, AreBumpedToNow)
+{
+    const TemporaryFolder folder;
+    const CFileRef file(folder.write("file", "x").c_str(), false);
+    ASSERT_EQ(CFileUtilSetUTCModDate(file, 10), 0);
+    const std::int64_t before = platform::currentTime();
+    EXPECT_EQ(CFileUtilBumpDate(file), 0);
+    EXPECT_NEAR(CFileUtilUTCModDate(file) + 978'307'200, static_cast<double>(before), 60);
+    EXPECT_EQ(CFileUtilBumpDate(CFileRef((folder / "missing").c_str(), false)), kStatusFileNotFound);
+    EXPECT_EQ(CFileUtilBumpDate(CFileRef::None), kStatusParameterError);
+}
+
 TEST(Dates, OfOldCatalogsAreInLocalTime)
 {
     const TemporaryFolder folder;

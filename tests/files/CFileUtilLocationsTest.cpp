@@ -8,6 +8,12 @@
 
 #include <gtest/gtest.h>
 
+#include <sched.h>
+#include <sys/mount.h>
+#include <sys/statvfs.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
 namespace fs = std::filesystem;
 
 namespace {
@@ -41,6 +47,89 @@ TEST(Volumes, LinesOfTheMountTable)
     for (const char* none :
          {"", "36", "x 35 98:0 / / rw - ext4 /dev/x rw", "36 35 98:0 / / rw -", "36 35 98:0 / / rw x"})
         EXPECT_FALSE(platform::mountFromLine(none)) << none;
+}
+
+TEST(Volumes, EscapesInTheMountTable)
+{
+    for (const auto& [written, folder] : {std::pair{"/ends\\040", "/ends "},
+                                          {"/cut\\04", "/cut\\04"},
+                                          {"/x\\", "/x\\"},
+                                          {"/no\\08x", "/no\\08x"},
+                                          {"/\\134040", "/\\040"}}) {
+        const auto mount = platform::mountFromLine("36 35 98:0 / " + std::string(written) + " rw - ext4 /dev/x rw");
+        ASSERT_TRUE(mount);
+        EXPECT_EQ(mount->folder, folder);
+    }
+}
+
+TEST(Volumes, FreeSpaceIsThatOfTheNearestFolder)
+{
+    const TemporaryFolder folder;
+    struct statvfs status = {};
+    ASSERT_EQ(::statvfs(folder.path().c_str(), &status), 0);
+    const auto expected = static_cast<long long>(status.f_blocks * status.f_frsize);
+    for (const std::string& path : {folder / "", folder.write("file", "x"), folder / "no/such/file"}) {
+        long long total = -1;
+        const long long free = CFileUtilFreeDiskSpaceAtPath(file(path), &total);
+        EXPECT_TRUE(free > 0 && free < expected) << path;
+        EXPECT_EQ(total, expected) << path;
+        EXPECT_GT(CFileUtilFreeDiskSpaceAtPath(file(path), nullptr), 0);
+    }
+    long long total = -1;
+    EXPECT_EQ(CFileUtilFreeDiskSpaceAtPath(CFileRef::None, &total), 0);
+    EXPECT_EQ(total, 0);
+}
+
+TEST(Volumes, NetworkFileSystemsGoByTheirNames)
+{
+    for (const char* name : {"nfs", "nfs4", "cifs", "fuse.sshfs"})
+        EXPECT_TRUE(platform::isNetworkFileSystem(name)) << name;
+    for (const char* name : {"", "ext4", "fuse", "nfs3x", "overlay"})
+        EXPECT_FALSE(platform::isNetworkFileSystem(name)) << name;
+    const TemporaryFolder folder;
+    EXPECT_FALSE(CFileUtilIsNetworkDrive(file(folder / "")));
+    EXPECT_FALSE(CFileUtilIsNetworkDrive(CFileRef::None));
+    EXPECT_FALSE(CFileUtilIsReadOnlyVolume(file(folder / "")));
+    EXPECT_FALSE(CFileUtilIsReadOnlyVolume(file(folder / "missing")));
+    EXPECT_FALSE(CFileUtilIsReadOnlyVolume(CFileRef::None));
+}
+
+// In a mount table of its own, which takes a process of its own.
+TEST(Volumes, MountsAreTakenForWhatTheyAre)
+{
+    const TemporaryFolder folder;
+    for (const char* name : {"lower", "upper", "work", "merged", "bound"})
+        fs::create_directory(folder / name);
+    folder.write("lower/file", "x");
+    const pid_t child = ::fork();
+    if (child == 0) {
+        if (::unshare(CLONE_NEWNS) != 0 || ::mount("none", "/", nullptr, MS_REC | MS_PRIVATE, nullptr) != 0 ||
+            ::mount((folder / "lower").c_str(), (folder / "bound").c_str(), nullptr, MS_BIND, nullptr) != 0)
+            ::_exit(99);
+        ::mount("none", (folder / "bound").c_str(), nullptr, MS_BIND | MS_REMOUNT | MS_RDONLY, nullptr);
+        int failed = 0;
+        const auto expect = [&failed](int number, bool holds) { failed = failed == 0 && !holds ? number : failed; };
+        const CFileRef lower = file(folder / "lower/file"), bound = file(folder / "bound/file");
+        expect(1, CFileUtilIsReadOnlyVolume(bound) && !CFileUtilIsReadOnlyVolume(lower));
+        expect(2, !CFileUtilItemsOnSameVolume(lower, bound)); // one device: a rename fails all the same
+        expect(3, !bound.IsRoot());
+        const std::string layers =
+            "lowerdir=" + (folder / "lower") + ",upperdir=" + (folder / "upper") + ",workdir=" + (folder / "work");
+        if (::mount("overlay", (folder / "merged").c_str(), "overlay", 0, layers.c_str()) == 0) {
+            const CFileRef merged = file(folder / "merged/file");
+            expect(4, !merged.IsRoot() && directory(folder / "merged").IsRoot());
+            expect(5, std::string(merged.GetMountPoint()) == folder / "merged");
+            expect(6, CFileUtilItemsOnSameVolume(merged, directory(folder / "merged")));
+            ::umount((folder / "merged").c_str());
+        }
+        ::_exit(failed);
+    }
+    int status = 0;
+    ASSERT_EQ(::waitpid(child, &status, 0), child);
+    ASSERT_TRUE(WIFEXITED(status));
+    if (WEXITSTATUS(status) == 99)
+        GTEST_SKIP() << "no mounts of one's own here";
+    EXPECT_EQ(WEXITSTATUS(status), 0) << "the number of the expectation";
 }
 
 TEST(Locations, Trash)
@@ -92,7 +181,7 @@ TEST(Locations, LibrariesCloudAndApplication)
         {"any/Library.bundle/x.wav", false, true, false},
         {"any/org.ktfiles.installed.content/x.wav", false, true, false},
         {"Sampler.app/sounds/x.wav", false, false, true},
-        {"Sampler.apple/x.wav", false, false, false},
+        {"Sampler.appendix/x.wav", false, false, false},
     };
     for (const Case& each : cases) {
         SCOPED_TRACE(each.path);

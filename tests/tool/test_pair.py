@@ -62,6 +62,18 @@ class LongInfo(CommandTest):
         self.assertEqual((plain["typeByName"], plain["fileType"]), ("Midi", "WAVE"))
         self.assertNotIn("stereoPartner", plain)
 
+    def test_partners_in_any_case(self):
+        for left, right in (("a.L.Wav", "a.R.WAV"), ("b.L.WAV", "b.r.Wav"), ("C.AIL", "C.aIr"), ("d.L.wav", "d.R.wav")):
+            with self.subTest(left):
+                self.write(left, wave())
+                self.write(right, wave())
+                for name, partner in ((left, right), (right, left)):
+                    told = self.json("info", name)
+                    self.assertEqual((told["stereoPartner"], told["stereoPartnerExists"]), (partner, True))
+        self.write("e.L.Wav", wave())
+        self.write("E.R.wav", wave())  # the rest of the name must be the same
+        self.assertFalse(self.json("info", "e.L.Wav")["stereoPartnerExists"])
+
 
 if __name__ == "__main__":
     unittest.main()

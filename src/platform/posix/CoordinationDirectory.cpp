@@ -90,9 +90,8 @@ CoordinationDirectory::CoordinationDirectory(const std::string& path)
 
 Descriptor CoordinationDirectory::openFile(const std::string& name)
 {
-    Descriptor file([&] {
-        return ::openat(folder_.get(), name.c_str(), O_RDWR | O_CREAT | O_NOFOLLOW | O_CLOEXEC | O_NONBLOCK, 0600);
-    });
+    Descriptor file(
+        [&] { return ::openat(folder_.get(), name.c_str(), O_RDWR | O_CREAT | O_NOFOLLOW | O_CLOEXEC, 0600); });
     struct stat status;
     if (!file && errno == ENOENT && ::fstat(folder_.get(), &status) == 0 && status.st_nlink == 0) {
         deleted_.store(true, std::memory_order_relaxed);

@@ -1,8 +1,13 @@
 #include "platform/SystemCalls.h"
 
+#include "platform/core/ASCIICase.h"
+
+#include <algorithm>
 #include <cerrno>
 #include <cstdio>
 #include <cstring>
+#include <string>
+#include <string_view>
 
 #include <fcntl.h>
 #include <linux/openat2.h>
@@ -14,10 +19,24 @@ namespace platform {
 
 namespace {
 
-// O_NONBLOCK means nothing to a regular file; it keeps the open of anything else from waiting.
-int openFlags(OpenFor access)
+enum class Waiting : bool { no, yes };
+enum class Links : bool { followed, refused };
+
+/// Without waiting, so that what turns out not to be a regular file does not hold the caller up.
+int openFlags(OpenFor access, Waiting waiting = Waiting::no)
 {
-    return (access == OpenFor::reading ? O_RDONLY : O_RDWR) | O_CLOEXEC | O_NOCTTY | O_NONBLOCK;
+    return (access == OpenFor::reading ? O_RDONLY : O_RDWR) | O_CLOEXEC | O_NOCTTY |
+           (waiting == Waiting::no ? O_NONBLOCK : 0);
+}
+
+int openPath(const char* path, int flags, Links links)
+{
+    if (links == Links::followed)
+        return ::open(path, flags);
+    open_how how = {};
+    how.flags = static_cast<unsigned>(flags);
+    how.resolve = RESOLVE_NO_SYMLINKS;
+    return static_cast<int>(syscall(SYS_openat2, AT_FDCWD, path, &how, sizeof how));
 }
 
 FileStatus fileStatus(const struct stat& from)
@@ -86,19 +105,55 @@ int regularFileOnly(int descriptor, FileStatus* status)
     return -1;
 }
 
+/// Another process, a file server say, may hold a lease on a regular file. Such a file is waited for, as a plain open
+/// does: the kernel asks the holder to give the lease back, and takes it after a time. What lies at the path is held by
+/// a descriptor that opens nothing, so that nothing else can take its place meanwhile.
+int openLeasedFile(const char* path, OpenFor access, Links links)
+{
+    const int item = regularFileOnly(openPath(path, O_PATH | O_CLOEXEC, links), nullptr);
+    if (item < 0)
+        return -1;
+    const std::string itself = "/proc/self/fd/" + std::to_string(item);
+    const int descriptor = ::open(itself.c_str(), openFlags(access, Waiting::yes));
+    const int reason = errno;
+    ::close(item);
+    errno = reason;
+    return descriptor;
+}
+
+int openRegularFile(const char* path, OpenFor access, Links links, FileStatus* status)
+{
+    int descriptor = openPath(path, openFlags(access), links);
+    if (descriptor < 0 && errno == EWOULDBLOCK)
+        descriptor = openLeasedFile(path, access, links);
+    return regularFileOnly(descriptor, status);
+}
+
 int openFile(const char* path, OpenFor access, FileStatus* status)
 {
     FileStatus found;
     if (!pathStatus(path, &found) || !isRegular(found))
         return -1;
-    return regularFileOnly(::open(path, openFlags(access)), status);
+    return openRegularFile(path, access, Links::followed, status);
 }
 
-/// Whether merely opening what lies at the path could do something: writing to a FIFO or device, or reading where
-/// devices live. A status of its own would cost an open for reading a quarter of its time.
+/// Whether the path ends as those of recordings and loops do, which are read by the hundred thousand.
+bool endsLikeRecording(std::string_view path)
+{
+    const std::string_view end = path.substr(path.size() - std::min<std::size_t>(path.size(), 5));
+    for (const std::string_view extension : {".wav", ".aif", ".aiff", ".aifc", ".caf"})
+        if (equalIgnoringASCIICase(end.substr(end.size() - std::min(end.size(), extension.size())), extension))
+            return true;
+    return false;
+}
+
+/// Whether merely opening what lies at the path could do something: to open a device, or to let go whoever waits to
+/// write into a FIFO, and take its reader away again. To look first costs an open for reading a quarter of its time, so
+/// that a FIFO is trusted not to be called a recording.
 bool needsLookBeforeOpening(const char* path, OpenFor access)
 {
-    return access != OpenFor::reading || path[0] != '/' || std::strstr(path, "/dev/") != nullptr;
+    return access != OpenFor::reading || path[0] != '/' || std::strstr(path, "/dev/") != nullptr ||
+           !endsLikeRecording(path);
 }
 
 int openFileWithoutLinks(const char* path, OpenFor access, FileStatus* status)
@@ -108,13 +163,10 @@ int openFileWithoutLinks(const char* path, OpenFor access, FileStatus* status)
         if (!pathStatus(path, &found) || !isRegular(found))
             return -1;
     }
-    open_how how = {};
-    how.flags = static_cast<unsigned>(openFlags(access));
-    how.resolve = RESOLVE_NO_SYMLINKS;
-    const int descriptor = static_cast<int>(syscall(SYS_openat2, AT_FDCWD, path, &how, sizeof how));
+    const int descriptor = openRegularFile(path, access, Links::refused, status);
     if (descriptor < 0 && errno == EPERM)
         errno = ENOSYS; // what a container's filter of system calls answers
-    return regularFileOnly(descriptor, status);
+    return descriptor;
 }
 
 int createFile(const char* path, std::uint32_t permissions)

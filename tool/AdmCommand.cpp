@@ -1,4 +1,5 @@
 // ktfiles adm: what an ADM document describes, as a tree or as JSON, and what is wrong with it.
+#include "AdmCheck.h"
 #include "AdmJson.h"
 #include "AdmSource.h"
 #include "AdmTree.h"
@@ -43,9 +44,8 @@ ADMDocumentOptions optionsFor(const AdmArguments& arguments)
 enum class Diagnose : bool { no, yes };
 
 /// Throws the Failure of a file that cannot be read, but not for what is wrong with the document.
-ReadDocument readDocument(const std::string& path, const AdmArguments& arguments, bool quiet, Diagnose diagnose)
+ReadDocument readDocument(AdmSource& source, const AdmArguments& arguments, bool quiet, Diagnose diagnose)
 {
-    AdmSource source(path);
     ReadDocument read;
     read.document = std::make_unique<ADMDocument>(nullptr);
     read.document->setOptions(optionsFor(arguments));
@@ -79,9 +79,11 @@ std::string problemText(const ADMDiagnostic& diagnostic)
     return diagnostic.kind + ": " + diagnostic.text;
 }
 
-/// "FILE:LINE:COLUMN", as programs that go to such places expect it.
+/// "FILE:LINE:COLUMN", as programs that go to such places expect it; the file alone for what has no place in it.
 std::string placeText(const std::string& path, const ADMDiagnostic& diagnostic)
 {
+    if (diagnostic.position.line == 0)
+        return path;
     return fmt::format("{}:{}:{}", path, diagnostic.position.line, diagnostic.position.column);
 }
 
@@ -117,12 +119,16 @@ private:
         try {
             const FileAccess access = accessForReading(path, {.quiet = options_.quiet});
             const bool tells = arguments_.isCheck || arguments_.isLenient;
-            ReadDocument read = readDocument(path, arguments_, options_.quiet, tells ? Diagnose::yes : Diagnose::no);
+            AdmSource source(path);
+            ReadDocument read = readDocument(source, arguments_, options_.quiet, tells ? Diagnose::yes : Diagnose::no);
             // To know the place of everything costs a ninth of the time, which only documents with a problem pay.
             if (!read.isComplete && !tells)
-                read = readDocument(path, arguments_, options_.quiet, Diagnose::yes);
-            if (arguments_.isCheck)
+                read = readDocument(source, arguments_, options_.quiet, Diagnose::yes);
+            if (arguments_.isCheck) {
+                for (ADMDiagnostic& problem : checkFurther(source, *read.document, read.isComplete))
+                    read.diagnostics.push_back(std::move(problem));
                 return check(path, read);
+            }
             if (!read.isComplete) {
                 const ADMDiagnostic last = read.diagnostics.back();
                 read.diagnostics.pop_back();
@@ -138,8 +144,7 @@ private:
 
     bool fail(const std::string& path, const ADMDiagnostic& problem)
     {
-        const bool hasPlace = problem.position.line != 0;
-        return fail(path, hasPlace ? placeText(path, problem) : path, problemText(problem));
+        return fail(path, placeText(path, problem), problemText(problem));
     }
 
     bool fail(const std::string& path, const std::string& place, const std::string& text)

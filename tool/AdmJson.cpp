@@ -1,5 +1,6 @@
 #include "AdmJson.h"
 
+#include "AdmWords.h"
 #include "JsonWriter.h"
 #include "adm/ADMAudioBlockFormat_DirectSpeaker.h"
 #include "adm/ADMAudioBlockFormat_Object.h"
@@ -98,7 +99,7 @@ void writeMembers(JsonWriter& json, const ADMAudioPackFormat& pack)
     json.member("audioPackFormatID", pack.audioPackFormatID());
     json.member("audioPackFormatName", pack.audioPackFormatName());
     json.member("type", pack.type());
-    json.member("importance", pack.importance());
+    json.member("importance", signedImportance(pack));
     json.member("absoluteDistance", pack.absoluteDistance());
     json.member("audioChannelFormatIDRefs", pack.audioChannelFormatIDRefs());
     json.member("audioPackFormatIDRefs", pack.audioPackFormatIDRefs());

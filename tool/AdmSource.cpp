@@ -1,6 +1,7 @@
 #include "AdmSource.h"
 
 #include "ChunkBody.h"
+#include "EditGuards.h"
 #include "Failure.h"
 #include "InputFile.h"
 
@@ -53,6 +54,7 @@ AdmSource::AdmSource(const std::string& path)
     if (length == 0)
         throw Failure("is empty");
     if (file_.Info().fileType == kCaff || file_.IsChunkBased() != 0) {
+        isAudio_ = true;
         const ChunkBody chunk = requireChunk(file_, fourCC("axml"));
         begin_ = chunk.offset;
         end_ = chunk.offset + chunk.size;
@@ -74,8 +76,32 @@ std::unique_ptr<platform::InputStream> AdmSource::stream()
     return std::make_unique<FileRangeStream>(file_, begin_, end_);
 }
 
+std::optional<Bytes> AdmSource::trackChunk()
+{
+    constexpr std::int64_t largest = 4 + 65535 * 40; // a header and as many entries as it counts
+    const ChunkSurvey survey = isAudio_ ? surveyChunks(file_, fourCC("chna")) : ChunkSurvey();
+    if (!survey.found)
+        return std::nullopt;
+    const std::int64_t offset = bodyOffset(*survey.found, survey.extent);
+    const std::int64_t there = std::min(survey.found->size, survey.extent.fileLength - offset);
+    Bytes body(static_cast<std::size_t>(std::clamp<std::int64_t>(there, 0, largest)));
+    requireOK(file_.Read(body.data(), offset, static_cast<long>(body.size()), nullptr));
+    return body;
+}
+
+bool AdmSource::isUTF16()
+{
+    using namespace std::string_view_literals;
+    std::array<char, 2> head{};
+    file_.Read(head.data(), begin_, static_cast<long>(head.size()), nullptr);
+    const std::string_view start(head.data(), head.size());
+    return start == "\xFE\xFF"sv || start == "\xFF\xFE"sv || start == "<\0"sv || start == "\0<"sv;
+}
+
+/// In UTF-16 a zero byte may be half a character: what is left has an even size.
 void AdmSource::dropTrailingNuls()
 {
+    const std::int64_t end = end_;
     std::array<char, 4096> piece;
     while (end_ > begin_) {
         const auto count = std::min(end_ - begin_, static_cast<std::int64_t>(piece.size()));
@@ -86,4 +112,6 @@ void AdmSource::dropTrailingNuls()
         if (last != std::string_view::npos)
             break;
     }
+    if (size() % 2 != 0 && end_ < end && isUTF16())
+        ++end_;
 }

@@ -6,6 +6,7 @@
 
 #include <cstdint>
 #include <memory>
+#include <optional>
 #include <string>
 
 /// An open file, read in pieces.
@@ -14,6 +15,12 @@ public:
     /// Throws Failure: also for what is neither XML nor a container, and for a container without the chunk.
     explicit AdmSource(const std::string& path);
 
+    /// Whether the XML is a chunk of an audio file.
+    bool isAudio() const { return isAudio_; }
+    int channels() const { return file_.Info().channels; }
+    /// What there is of the body of the chunk "chna"; null where there is no such chunk.
+    std::optional<Bytes> trackChunk();
+
     /// Bytes of XML. NUL bytes at the end, which some programs reserve in the chunk, do not count.
     std::int64_t size() const { return end_ - begin_; }
     /// Must not outlive the source.
@@ -21,8 +28,10 @@ public:
 
 private:
     void dropTrailingNuls();
+    bool isUTF16();
 
     CAudioFileIO file_;
+    bool isAudio_ = false;
     std::int64_t begin_ = 0;
     std::int64_t end_ = 0;
 };

@@ -55,6 +55,8 @@ std::int64_t endOf(std::int64_t start, std::int64_t duration)
 // At most four digits, which is finer than anything that is heard.
 std::string numberText(double value)
 {
+    if (std::isinf(value)) // more than a number here can be
+        return value > 0 ? "∞" : "-∞";
     return fmt::format("{:.4g}", value == 0 ? 0 : value); // no "-0"
 }
 
@@ -67,7 +69,7 @@ std::string gainText(float gain, int unit)
         return "gain " + numberText(gain) + " dB";
     if (gain == 0)
         return "silent";
-    if (gain < 0)
+    if (gain < 0 || std::isinf(gain))
         return "gain " + numberText(gain);
     return fmt::format("gain {} ({:.1f} dB)", numberText(gain), 20 * std::log10(static_cast<double>(gain)));
 }
@@ -237,10 +239,15 @@ AdmNode describe(const ADMAudioObject& object)
     return node;
 }
 
+std::int64_t signedImportance(const ADMAudioPackFormat& pack)
+{
+    return static_cast<std::int64_t>(pack.importance());
+}
+
 AdmNode describe(const ADMAudioPackFormat& pack)
 {
     AdmNode node{"pack", pack.audioPackFormatName(), pack.audioPackFormatID(), {ADMGetNameForType(pack.type())}};
-    addImportance(node.details, static_cast<double>(pack.importance()), 10);
+    addImportance(node.details, static_cast<double>(signedImportance(pack)), 10);
     if (pack.absoluteDistance() != 0)
         node.details.push_back("distances in " + numberText(pack.absoluteDistance()) + " m");
     return node;

@@ -58,6 +58,58 @@ TEST(ADMDocument, EveryElementTwiceIsReplaced)
     EXPECT_EQ(document->audioContents().begin()->audioObjects().at(0), &narrator);
 }
 
+// What a parse left open when it failed is no part of the next.
+TEST(ADMDocument, ASecondParseStartsAnew)
+{
+    const auto parse = [](ADMDocument& document, const std::string& text) {
+        const BytesView bytes = bytesOf(text);
+        platform::MemoryInputStream stream(Bytes(bytes.begin(), bytes.end()));
+        return document.parseStream(stream);
+    };
+    const std::string object = named("audioObject", "AO_1001", "", "<gain>0.5</gain>");
+    for (const std::string& broken : {enveloped("<audioContent audioContentID='ACO_1001' audioContentName='c'>"),
+                                      enveloped(named("audioContent", "ACO_1001", "", "<dialogue>1<x>")),
+                                      enveloped(channel("<audioBlockFormat audioBlockFormatID='AB_00020001_00000001'>"
+                                                        "<gain>"))}) {
+        ADMDocument document(nullptr);
+        document.setOptions({.skipUnsupportedBlocks = true});
+        EXPECT_FALSE(parse(document, broken.substr(0, broken.find("</audioFormatExtended>"))));
+        EXPECT_NE(document.parseError(), nullptr);
+        ASSERT_TRUE(parse(document, enveloped("<stray>text</stray>" + object)));
+        EXPECT_EQ(document.parseError(), nullptr);
+        EXPECT_TRUE(document.currentElements().empty());
+        EXPECT_TRUE(document.currentGenericElements().empty());
+        ASSERT_EQ(document.audioObjects().size(), 1U);
+        EXPECT_EQ(document.audioObjects().begin()->gain(), 0.5F);
+        EXPECT_TRUE(document.audioContents().empty());
+    }
+}
+
+TEST(ADMDocument, LookingUpWithoutAPrefixFindsNothing)
+{
+    const auto document = documentOf(enveloped(named("audioObject", "AO_1001")));
+    ASSERT_TRUE(document->parse());
+    EXPECT_EQ(document->findADMElementRef("AO_1001", ""), nullptr);
+    EXPECT_EQ(document->findADMElementRef(std::nullopt, "AO"), nullptr);
+    EXPECT_EQ(document->findADMElementRef("AO_1001"), &*document->audioObjects().begin());
+    EXPECT_EQ(raised([&] { document->findADMElementRef("AO_1001", "AC"); }),
+              "MissingDefinition: 'AO_1001' referenced, but not defined");
+}
+
+TEST(ADMDocument, OffsetsOfAnObjectByTheirCoordinates)
+{
+    std::string offsets;
+    int value = 0;
+    for (const char* coordinate : {"azimuth", "elevation", "distance", "X", "Y", "Z", "W"})
+        offsets += "<positionOffset coordinate='" + std::string(coordinate) + "'>" + std::to_string(++value) +
+                   "</positionOffset>";
+    const auto document = documentOf(enveloped(named("audioObject", "AO_1001", "", offsets)));
+    ASSERT_TRUE(document->parse());
+    const ADMAudioObject& object = *document->audioObjects().begin();
+    EXPECT_EQ(object.polarOffset(), (ADMPolarOffset{1, 2, 3}));
+    EXPECT_EQ(object.cartesianOffset(), (ADMCartesianOffset{4, 5, 6}));
+}
+
 TEST(ADMDocument, SubElementsAreFlattened)
 {
     // An inner sub-element is given to the ADM element before the outer one; elements within others still count.

@@ -4,6 +4,8 @@
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
+#include <cstring>
 #include <stdexcept>
 
 using namespace platform;
@@ -119,7 +121,7 @@ TEST(XMLParser, WhatIsRefused)
         {"<!DOCTYPE a [<!ENTITY % x SYSTEM 'file:///etc/hostname'> %x;]><a/>", "a declaration inside the DOCTYPE"},
         {"<!DOCTYPE a [<!ATTLIST a b (c|d) 'c'>]><a/>", "a declaration inside the DOCTYPE"},
         {"<a x='1' x='2'/>", "Attribute x redefined"},
-        {"<a>\xFF</a>", "Input is not proper UTF-8, indicate encoding !\nBytes: 0xFF 0x3C 0x2F 0x61"},
+        {"<a>\xFF</a>", "Input is not proper UTF-8, indicate encoding ! Bytes: 0xFF 0x3C 0x2F 0x61"},
         {"<a>\xED\xA0\x80</a>", "Char 0xD800 out of allowed range"},
         {std::string("<a>\0</a>", 8), "a NUL character"},
         {"<?xml version='1.0' encoding='EBCDIC-US'?><a/>", "the encoding 'EBCDIC-US' is not supported"},
@@ -158,6 +160,65 @@ TEST(XMLParser, LongTextIsNoLongTag)
     const std::string value(15'000, 'x'), blanks(3'000'000, '\n');
     MemoryInputStream behindBlanks(bytesFrom("<!DOCTYPE a>" + blanks + "<a x='" + value + "'/>" + blanks));
     EXPECT_EQ(heard(behindBlanks), "<a x='" + value + "'></a>.");
+}
+
+// The same tag is taken or refused wherever it stands, and however the bytes come.
+TEST(XMLParser, TheLimitOfATagIsTheSameEverywhere)
+{
+    constexpr std::size_t limit = 16 * 1024;
+    const auto tag = [](std::size_t size) { return "<b c='" + std::string(size - 9, 'v') + "'/>"; };
+    for (std::size_t ahead = 0; ahead < 9000; ahead += 450)
+        for (const bool isWithin : {true, false})
+            for (const bool isSlow : {true, false}) {
+                const std::string text = "<a>" + std::string(ahead, 'x') + tag(limit + (isWithin ? 0 : 1)) + "</a>";
+                SlowStream slow(text, 0);
+                MemoryInputStream fast(bytesFrom(text));
+                const std::string said = heard(isSlow ? static_cast<InputStream&>(slow) : fast);
+                EXPECT_EQ(said.ends_with("</a>."), isWithin) << ahead << isSlow;
+                EXPECT_EQ(said.ends_with(" ! a tag is too long"), !isWithin) << ahead << isSlow;
+            }
+}
+
+/// Where the parser says that the elements "b" begin.
+class Places final : public XMLHandler {
+public:
+    void startElement(std::string_view name, const XMLAttributes&) override
+    {
+        if (name == "b")
+            found.push_back(parser->elementPosition());
+    }
+    void endElement(std::string_view) override {}
+    void characters(std::string_view) override {}
+
+    std::vector<XMLPosition> found;
+    XMLParser* parser = nullptr;
+};
+
+// The start of a long line may be gone when a tag of several lines ends: its column is not known then.
+TEST(XMLParser, AColumnIsTrueOrUnknown)
+{
+    bool wasUnknown = false;
+    for (const std::uint32_t ahead : {0U, 10U, 3000U, 5000U, 20'000U})
+        for (const char* tag : {"<b c='1'/>", "<b\n\n c='1'/>"}) {
+            Places places;
+            const std::string text = "\n<a>" + std::string(ahead, 'x') + tag + tag + "\n" + tag + "</a>";
+            MemoryInputStream stream(bytesFrom(text));
+            XMLParser parser(stream, places);
+            places.parser = &parser;
+            ASSERT_TRUE(parser.parse());
+            const auto breaks = static_cast<std::uint32_t>(std::count(tag, tag + std::strlen(tag), '\n'));
+            const XMLPosition expected[] = {
+                {2, ahead + 4}, {2 + breaks, breaks != 0 ? 9 : ahead + 14}, {3 + 2 * breaks, 1}};
+            ASSERT_EQ(places.found.size(), 3U);
+            for (std::size_t i = 0; i < 3; ++i) {
+                const bool isUnknown = i == 0 && breaks != 0 && ahead > 4000 && places.found[i].column == 0;
+                wasUnknown = wasUnknown || isUnknown;
+                EXPECT_EQ(places.found[i].line, expected[i].line);
+                if (!isUnknown)
+                    EXPECT_EQ(places.found[i].column, expected[i].column) << ahead << tag << i;
+            }
+        }
+    EXPECT_TRUE(wasUnknown);
 }
 
 TEST(XMLParser, EndsBeforeTheDocumentDoes)

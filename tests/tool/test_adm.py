@@ -1,6 +1,7 @@
 """ktfiles adm: where the document comes from, the tree, JSON, strict, lenient and checked."""
 import json
 import re
+import struct
 import subprocess
 import unittest
 import xml.etree.ElementTree as ElementTree
@@ -60,6 +61,17 @@ class Source(CommandTest):
             self.write(name, content)
             with self.subTest(name):
                 self.assertEqual(self.lines("adm", name), ["0\tobject\tAO_1001\to1001\t"])
+
+    def test_utf16_in_a_chunk(self):
+        """The second half of the last character may be a zero byte, like what is reserved behind it."""
+        text = document(audio_object("AO_1001")).decode().replace("?>", ' encoding="UTF-16"?>')
+        for encoding in ("utf-16-le", "utf-16-be"):
+            for mark in ("\ufeff", ""):
+                for nuls in (0, 1, 2, 5, 5000):
+                    xml = (mark + text.rstrip()).encode(encoding) + bytes(nuls)
+                    self.write("a.wav", wave(chunk(b"axml", xml)))
+                    with self.subTest(encoding, mark=mark, nuls=nuls):
+                        self.assertEqual(self.lines("adm", "a.wav"), ["0\tobject\tAO_1001\to1001\t"])
 
     def test_no_document(self):
         for name, content, error in (
@@ -137,6 +149,19 @@ o1002  AO_1002  object
         self.assertIn("\x1b[2mAO_1001\x1b[0m", self.on_terminal("adm", "a.xml", NO_COLOR="")[0])
         self.assertEqual(len(self.lines("adm", "a.xml")), 15)  # a pipe gets all blocks
         self.assertEqual(self.lines("adm", "--quiet", "a.xml"), [])
+
+    def test_numbers_beyond_measure(self):
+        pack = named("audioPackFormat", "AP_00031001", "p", more='typeLabel="0003" importance="-1"')
+        self.write("a.xml", document(
+            audio_object("AO_1001", "<gain>1e999</gain>", '<positionOffset coordinate="X">-1e999</positionOffset>',
+                         more='importance="-1"'), pack,
+            channel(block(1, position(azimuth="1e999", elevation=0), '<gain gainUnit="dB">-1e999</gain>'))))
+        self.assertEqual([line.split("\t")[4] for line in self.lines("adm", "a.xml")], [
+            "gain ∞, importance -1, moved ∞ left", "Objects, importance -1", "Objects, 1 block",
+            "throughout, ∞° left, gain -∞ dB"])
+        given = self.json("adm", "a.xml")
+        self.assertEqual([given[key][0]["importance"] for key in ("objects", "packFormats")], [-1, -1])
+        self.assertIsNone(given["objects"][0]["gain"])
 
     def test_circles_and_many_ways(self):
         self.write("circle.xml", document(audio_object("AO_1001", reference("audioObject", "AO_1002", "AO_1001")),
@@ -276,6 +301,79 @@ class Problems(CommandTest):
         self.assertEqual([len(item["problems"]) for item in self.json("adm", "--check", "good.xml", "bad.xml", status=1)],
                          [0, 3])
         self.failure("adm", "--check", "missing.xml")
+
+
+class Check(CommandTest):
+    def problems(self, content, name="a.xml", status=1):
+        self.write(name, content)
+        return [line.removeprefix(f"{name}:") for line in self.lines("adm", "--check", name, status=status)]
+
+    def test_no_elements(self):
+        nothing = " NoElements: no ADM elements"
+        self.assertEqual(self.problems(b"<html><body><p/></body></html>"), [nothing])
+        self.assertEqual(self.problems(b"<audioFormatExtended/>"), [nothing])
+        self.assertEqual(self.problems(wave(chunk(b"axml", b"<x/>")), "a.wav"), [nothing])
+        prefixed = b'<a:x xmlns:a="u">\n<a:audioObject/><a:audioContent/>\n<a:title/></a:x>'
+        self.assertEqual(self.problems(prefixed),
+                         ["2:1: PrefixedName: 'a:audioObject' has a prefix, and is not read, like another of 2 names",
+                          nothing])
+        self.assertEqual(self.problems(document(audio_object("AO_1001")) + b"<", "cut.xml")[0].split(": ")[1],
+                         "ParseError")  # and nothing of what may stand behind it
+
+    def test_duplicates_and_times(self):
+        times = ('rtime="00:00:01" duration="00:00:01.00000"', 'rtime="1.5"', 'rtime=""', 'rtime="00:00:00.10000S48000"')
+        self.assertEqual(self.problems(document(
+            audio_object("AO_1001"), audio_object("AO_1001", more='start="soon"'),
+            channel(*(block(i % 3, FRONT, times=time) for i, time in enumerate(times))),
+            channel(block(1, FRONT)).replace("AC_00031001", "AC_00031002"))), [
+                "4:1: DuplicateID: 'AO_1001' is defined more than once", "4:1: UnreadableTime: start 'soon' is no time",
+                "5:98: UnreadableTime: rtime '00:00:01' is no time", "5:329: UnreadableTime: rtime '1.5' is no time",
+                "5:697: DuplicateID: 'AB_00031001_00000000' is defined more than once"])
+        # Also behind what ends the reading of the elements.
+        self.assertEqual([line.split(": ")[1] for line in self.problems(document(
+            '<audioObject audioObjectID="AO_1"/>', audio_object("AO_1001"), audio_object("AO_1001")))],
+            ["MalformedDefinition", "DuplicateID"])
+
+    def test_tracks(self):
+        def chna(*entries, tracks=None, uids=None):
+            body = b"".join(struct.pack("<H12s14s11sx", track, *(text.encode() for text in texts))
+                            for track, *texts in entries)
+            used = {track for track, *_ in entries if track}
+            return chunk(b"chna", struct.pack("<HH", len(used) if tracks is None else tracks,
+                                              len(entries) if uids is None else uids) + body)
+
+        xml = document(
+            element("audioTrackUID", 'UID="ATU_0000000a"', reference("audioTrackFormat", "AT_00031001_01"),
+                    reference("audioPackFormat", "AP_00031001")),
+            named("audioTrackFormat", "AT_00031001_01", "t"), named("audioPackFormat", "AP_00031001", "p", more='typeLabel="0003"'))
+        one = (1, "ATU_0000000A", "AT_00031001_01", "AP_00031001")
+        for chunks, problems in (
+                ([chna(one)], []),
+                ([chna(one, (0, "", "", ""))], []),
+                ([chna((1, "ATU_0000000A", "", ""))], []),
+                ([], [" TrackMismatch: no chunk \"chna\" tells where the tracks are"]),
+                ([chna((2, *one[1:]))],
+                 [" TrackMismatch: the chunk \"chna\" has 'ATU_0000000A' in track 2, and the file 1 channel"]),
+                ([chna(one, one)], [" TrackMismatch: the chunk \"chna\" has 'ATU_0000000A' more than once"]),
+                ([chna(one, tracks=2)], [" TrackMismatch: the chunk \"chna\" counts 2 tracks, and uses 1"]),
+                ([chna(one, uids=3)], [" TrackMismatch: the chunk \"chna\" claims 3 entries, and has room for 1"]),
+                ([chna((1, "ATU_00000001", "", ""))],
+                 ["3:1: TrackMismatch: 'ATU_0000000a' is not in the chunk \"chna\"",
+                  " TrackMismatch: 'ATU_00000001' of the chunk \"chna\" is not defined"]),
+                ([chna((1, "ATU_0000000A", "AT_00031002_01", "AP_00031002"))],
+                 [f"3:1: TrackMismatch: 'ATU_0000000a' is of '{here}', and of '{there}' in the chunk \"chna\""
+                  for here, there in (("AT_00031001_01", "AT_00031002_01"), ("AP_00031001", "AP_00031002"))]),
+                ([chunk(b"chna", b"\1\0\1")],
+                 [" TrackMismatch: the chunk \"chna\" has 3 bytes, too few for its header",
+                  "3:1: TrackMismatch: 'ATU_0000000a' is not in the chunk \"chna\""])):
+            with self.subTest(problems):
+                self.assertEqual(self.problems(wave(chunk(b"axml", xml), *chunks), "a.wav", status=1 if problems else 0),
+                                 problems)
+
+    def test_messages_stay_on_one_line(self):
+        self.write("a.xml", b"<a>\xff</a>")
+        self.assertNotIn("\\x0A", self.failure("adm", "a.xml"))
+        self.assertNotIn("\n", self.json("adm", "--check", "a.xml", status=1)["problems"][0]["reason"])
 
 
 class Large(CommandTest):

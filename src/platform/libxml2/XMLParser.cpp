@@ -18,9 +18,11 @@ namespace platform {
 
 namespace {
 
-// The parser compares every attribute of a tag with every other, so that a tag for which more than this is read is
-// refused: time stays in proportion to the bytes.
+// The parser compares every attribute of a tag with every other, so that a longer tag is refused: time stays in
+// proportion to the bytes.
 constexpr std::size_t kLongestTag = 16 * 1024;
+// Reading stops where a tag would be longer in any case: what is read for one may begin ahead of it.
+constexpr std::size_t kLongestRead = 2 * kLongestTag;
 // It looks for a prefix among all the namespaces in force.
 constexpr int kMostNamespaces = 256;
 // It keeps every name to the end, in a few thousand lists: a million different ones would take minutes.
@@ -90,7 +92,7 @@ private:
         }
     }
     void start(const xmlChar* name, const xmlChar* prefix, int namespaces, const xmlChar** namespacePairs,
-               int attributes, const xmlChar** attributeRows);
+               int attributes, const xmlChar** attributeRows, std::size_t bytesRead);
     /// A name as it is written, out of the two parts into which the parser takes it; valid during the event.
     std::string_view written(const xmlChar* prefix, const xmlChar* name)
     {
@@ -104,6 +106,7 @@ private:
     void refuseManyNames();
     std::size_t longestStretch() const;
     void refuseLongStretch();
+    void refuseLongTag();
 
     struct FreeContext {
         void operator()(xmlParserCtxtPtr context) const
@@ -161,11 +164,14 @@ void XMLParser::Implementation::onStart(void* self, const xmlChar* name, const x
                                         const xmlChar** attributeRows)
 {
     auto& parser = *static_cast<Implementation*>(self);
-    parser.handle([&] { parser.start(name, prefix, namespaces, namespacePairs, attributes, attributeRows); });
+    const std::size_t bytesRead = parser.stretch_;
+    parser.handle(
+        [&] { parser.start(name, prefix, namespaces, namespacePairs, attributes, attributeRows, bytesRead); });
 }
 
 void XMLParser::Implementation::start(const xmlChar* name, const xmlChar* prefix, int namespaces,
-                                      const xmlChar** namespacePairs, int attributes, const xmlChar** attributeRows)
+                                      const xmlChar** namespacePairs, int attributes, const xmlChar** attributeRows,
+                                      std::size_t bytesRead)
 {
     // A tag that is cut off by the end of the document, or by what no tag may hold, is told before its error.
     const xmlChar* behind = context_->input->cur;
@@ -177,6 +183,8 @@ void XMLParser::Implementation::start(const xmlChar* name, const xmlChar* prefix
     if (namespaces_.back() > kMostNamespaces)
         return fail(XML_ERR_INTERNAL_ERROR, "too many namespaces are in force");
     refuseManyNames();
+    if (bytesRead > kLongestTag / 2) // less than that of a long tag can have been there before
+        refuseLongTag();
     if (stopped_)
         return;
 
@@ -215,9 +223,10 @@ void XMLParser::Implementation::onError(void* self, xmlErrorPtr error)
         return;
     auto& parser = *static_cast<Implementation*>(self);
     parser.handle([&] {
-        std::string_view message = error->message == nullptr ? "" : error->message;
+        std::string message = error->message == nullptr ? "" : error->message;
         while (message.ends_with('\n'))
-            message.remove_suffix(1);
+            message.pop_back();
+        std::replace(message.begin(), message.end(), '\n', ' ');
         // The message quotes the document, which may have names of any length.
         parser.fail(error->code, message.empty() || message.size() > 200 ? "it is not well-formed" : message);
     });
@@ -275,7 +284,7 @@ std::size_t XMLParser::Implementation::longestStretch() const
         return 0;
     case XML_PARSER_CONTENT:
     case XML_PARSER_ATTRIBUTE_VALUE:
-        return kLongestTag;
+        return kLongestRead;
     default:
         return kLongestAroundRoot;
     }
@@ -290,10 +299,20 @@ void XMLParser::Implementation::refuseLongStretch()
         stretch_ = 0;
     if (longest == 0 || stretch_ <= longest)
         return;
-    if (longest == kLongestTag)
+    if (longest == kLongestRead)
         fail(XML_ERR_ATTRIBUTE_NOT_FINISHED, "a tag is too long");
     else
         fail(XML_ERR_INTERNAL_ERROR, "there is too much around the root element");
+}
+
+/// At the end of a tag: its own bytes count, wherever in the document it stands.
+void XMLParser::Implementation::refuseLongTag()
+{
+    const std::string_view behind = viewOf(context_->input->base, context_->input->cur);
+    const std::size_t begin = behind.rfind('<');
+    const std::size_t end = context_->input->cur[0] == '>' ? 1 : 2; // ">" or "/>"
+    if (begin == behind.npos || behind.size() - begin + end > kLongestTag)
+        fail(XML_ERR_ATTRIBUTE_NOT_FINISHED, "a tag is too long");
 }
 
 void XMLParser::Implementation::refuseManyNames()
@@ -373,7 +392,7 @@ XMLPosition XMLParser::Implementation::elementPosition() const
     const std::string_view behind = viewOf(context_->input->base, context_->input->cur);
     const std::size_t begin = behind.rfind('<');
     if (begin == behind.npos)
-        return found;
+        return {};
     const std::string_view tag = behind.substr(begin);
     const auto breaks = static_cast<std::uint32_t>(std::count(tag.begin(), tag.end(), '\n'));
     const auto characters = [](std::string_view text) {
@@ -384,9 +403,11 @@ XMLPosition XMLParser::Implementation::elementPosition() const
     if (breaks == 0) {
         found.column -= std::min(characters(tag), found.column - 1);
     } else {
-        // The start of a very long line may have left the parser's buffer.
+        // The start of the line may have left the parser's buffer.
         const std::size_t lineBreak = behind.rfind('\n', begin);
-        found.column = characters(behind.substr(0, begin).substr(lineBreak == behind.npos ? 0 : lineBreak + 1)) + 1;
+        const bool isThere = lineBreak != behind.npos || context_->input->consumed == 0;
+        found.column =
+            isThere ? characters(behind.substr(0, begin).substr(lineBreak == behind.npos ? 0 : lineBreak + 1)) + 1 : 0;
     }
     return found;
 }

@@ -157,6 +157,13 @@ TEST(AudioFileInfo, BoundsAIFFSoundDataByTheFile)
     }
     EXPECT_EQ(describe(withSound(aiff(4), 16, 4)).dataOffset, 58);
     std::int32_t status = -1;
+    for (const std::int16_t channels : {0, -1}) {
+        Bytes content = withSound(aiff(4), 16);
+        storeBE(content.data() + 20, channels);
+        const AudioFileInfo info = describe(content);
+        EXPECT_EQ(info.channels, 0) << channels;
+        EXPECT_EQ(info.frames, 0) << channels;
+    }
     describe(aiff(4).bytes(), &status);
     EXPECT_EQ(status, kStatusEndOfFile);
 }

@@ -306,6 +306,8 @@ TEST(CAuFileIO, AFileThatCannotBeCreatedChangesNothing)
     EXPECT_EQ(file.OpenMode(), 1);
     EXPECT_FALSE(std::filesystem::exists(folder / "new"));
     EXPECT_EQ(file.CreateAndOpen(platform::URLRef(), 0, 1, 16, 44100, fourCC("WAVE"), nullptr), kStatusParameterError);
+    EXPECT_EQ(create("new", 1, 16, 44100, fourCC("WAVE")), 0);
+    EXPECT_EQ(file.NumFrames(), 0); // nothing is left of the file before
 }
 
 TEST(CAuFileIO, ByteOrderIsReversedUnlessTheFileIsWAVE)

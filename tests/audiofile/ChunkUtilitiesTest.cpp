@@ -84,6 +84,30 @@ TEST(ChunkUtilities, OtherFilesHaveAMetadataSidecarThatIsReadWhole)
     EXPECT_EQ(textOf(readFile(folder / "song.ktmd")), whole);
 }
 
+TEST(ChunkUtilities, ATaggedLoopIsSparedOnRequest)
+{
+    const TemporaryFolder folder;
+    Bytes tags(82); // "basc": version, 2 beats, type 1
+    storeBE(tags.data(), std::uint32_t{1});
+    storeBE(tags.data() + 4, std::uint32_t{2});
+    storeBE(tags.data() + 16, std::uint16_t{1});
+    const auto image = [&](bool isLoop) {
+        ContainerBuilder builder("FORM", "AIFF");
+        builder.format(22050).chunk("SSND", 8 + 2 * 22050);
+        return (isLoop ? builder.chunk("basc", tags) : builder).bytes();
+    };
+    const struct {
+        bool isLoop;
+        long flags;
+        const char* stored;
+    } cases[] = {{true, kChunkDataUnlessLoop, "(none)"}, {true, 0, "bcd"}, {false, kChunkDataUnlessLoop, "bcd"}};
+    for (const auto& [isLoop, flags, stored] : cases) {
+        const std::string path = folder.write("file.aif", image(isLoop));
+        EXPECT_EQ(add(path, "abc", flags), kStatusOK);
+        EXPECT_EQ(bodyIn(path), stored) << isLoop << flags;
+    }
+}
+
 TEST(ChunkUtilities, TheFirstSourceWins)
 {
     const TemporaryFolder folder;

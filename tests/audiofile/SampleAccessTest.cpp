@@ -159,6 +159,10 @@ TEST(SampleAccess, OverwritesButNeverGrowsIntoWhatIsNotItsOwn)
         CAudioFileIO file(CFileRef(path.c_str(), false), kFileIOReadWrite);
         EXPECT_EQ(file.WriteFrames(samples.data(), file.Info().frames, 1), kStatusParameterError) << name;
         EXPECT_EQ(file.WriteFrames(samples.data(), file.Info().frames + 1, 1), kStatusParameterError) << name;
+        EXPECT_EQ(file.WriteFrames(samples.data(), -1, 1), kStatusParameterError) << name;
+        EXPECT_EQ(file.WriteFrames(samples.data(), 7, -1), kStatusParameterError) << name;
+        EXPECT_EQ(file.WriteFrames(nullptr, 7, 1), kStatusParameterError) << name;
+        EXPECT_EQ(file.WriteFrames(nullptr, 7, 0), kStatusOK) << name;
         EXPECT_EQ(file.WriteFrames(samples.data(), 7, 1), kStatusOK) << name;
         float back[8] = {};
         EXPECT_EQ(file.ReadFrames(back, 7, 1), kStatusOK);

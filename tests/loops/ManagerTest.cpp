@@ -1,6 +1,8 @@
 // The chunks manager on real AIFF and CAF files: set, save, read, remove, and from one kind of file to the other.
 #include "LoopFiles.h"
 
+#include <filesystem>
+
 namespace {
 
 /// Chunks of others, the same in every file.
@@ -51,6 +53,14 @@ TEST_P(LoopManager, EveryKindIsReadAsItWasSet)
         EXPECT_EQ(walkContainer(readFile(path)), walkContainer(original)) << "nothing else is removed";
         EXPECT_EQ(tagsOf(path), Tags());
     }
+}
+
+TEST(LoopFile, ThatIsNotThereIsNeitherWrittenNorRemovedFrom)
+{
+    const TemporaryFolder folder;
+    EXPECT_FALSE(manage(folder / "none").writeChunks(everyKind(20)));
+    EXPECT_FALSE(manage(folder / "none").removeChunks(VireoLoopChunks::Empty()));
+    EXPECT_FALSE(std::filesystem::exists(folder / "none"));
 }
 
 // An item that becomes longer and has samples behind it goes behind them: the second one was the first one then.

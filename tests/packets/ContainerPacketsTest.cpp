@@ -3,6 +3,7 @@
 
 #include "platform/core/ByteWriter.h"
 #include "platform/core/Status.h"
+#include "support/Hex.h"
 
 #include <gtest/gtest.h>
 
@@ -223,6 +224,16 @@ TEST(ContainerPackets, ofMP4AreFoundByBoxesOfOtherWidths)
              storeBE(file.data() + at + 4, fourCC("mdat"));
              storeBE(file.data() + at + 8, size);
          }},
+        {"a movie that reaches to the end of the file",
+         [](Bytes& file) { storeBE(file.data() + bodyOf(file, "moov") - 8, std::uint32_t{0}); }},
+        {"a movie of a size of 64 bits",
+         [](Bytes& file) {
+             const std::size_t body = bodyOf(file, "moov"); // the last box: no offset points behind its header
+             const std::uint64_t size = loadBE<std::uint32_t>(file.data() + body - 8) + 8;
+             storeBE(file.data() + body - 8, std::uint32_t{1});
+             file.insert(file.begin() + static_cast<std::ptrdiff_t>(body), 8, std::byte{});
+             storeBE(file.data() + body, size);
+         }},
     };
     const TemporaryFolder folder;
     for (const auto& expected : cases) {
@@ -237,6 +248,50 @@ TEST(ContainerPackets, ofMP4AreFoundByBoxesOfOtherWidths)
     }
 }
 
+// "stz2": sizes of packets in 4, 8 or 16 bits each, where "stsz" has 32.
+TEST(ContainerPackets, ofMP4HaveSizesInFewerBits)
+{
+    const TemporaryFolder folder;
+    const Bytes original = readFile(encoded("ffmpeg -y -i IN -c:a aac OUT", "m4a", kSound));
+    const auto count = loadBE<std::uint32_t>(original.data() + bodyOf(original, "stsz") + 8);
+    ASSERT_EQ(count % 2, 1U); // so that the last byte of 4-bit sizes holds one
+    for (const std::uint8_t bits : {4, 8, 16}) {
+        SCOPED_TRACE(int{bits});
+        const auto sizeOf = [&](std::uint32_t i) { return bits == 16 ? 250 + i : i * 7 % ((1U << bits) - 1) + 1; };
+        Bytes wide = original, compact = original;
+        rename(compact, "stsz", "stz2");
+        std::byte* const sizes = compact.data() + bodyOf(compact, "stz2") + 12;
+        sizes[-5] = std::byte{bits};
+        std::fill_n(sizes, 4 * count, std::byte{});
+        for (std::uint32_t i = 0; i < count; ++i) {
+            put(wide, "stsz", 12 + 4 * i, sizeOf(i));
+            if (bits == 16)
+                storeBE(sizes + 2 * i, static_cast<std::uint16_t>(sizeOf(i)));
+            else
+                sizes[i * bits / 8] |= static_cast<std::byte>(sizeOf(i) << (bits == 4 && i % 2 == 0 ? 4 : 0));
+        }
+        const auto expected = opened(folder.write("wide", wide)), found = opened(folder.write("compact", compact));
+        ASSERT_TRUE(expected && found);
+        EXPECT_EQ(found->packetCount(), count);
+        EXPECT_EQ(allPackets(*found), allPackets(*expected));
+        put(compact, "stz2", 8, count * 32U / bits + 1); // a packet more than the box has room for
+        EXPECT_EQ(refusal(folder.write("compact", compact)), kStatusIOError);
+        put(compact, "stz2", 8, count);
+        for (const std::uint8_t other : {0, 7, 32}) {
+            put(compact, "stz2", 7, other);
+            EXPECT_EQ(refusal(folder.write("compact", compact)), kStatusIOError) << int{other};
+        }
+    }
+}
+
+TEST(ContainerPackets, ofADTSHaveAConfigurationThatSaysThatNoBandsAreReplicated)
+{
+    const auto source = opened(encoded("ffmpeg -y -i IN -c:a aac OUT", "aac", kSound));
+    ASSERT_TRUE(source);
+    const BytesView cookie = source->cookie();
+    EXPECT_EQ(Bytes(cookie.begin(), cookie.end()), fromHex("1210 56e500")); // ISO/IEC 14496-3: AudioSpecificConfig
+}
+
 TEST(ContainerPackets, ofCAF)
 {
     const auto source = opened(aacInMP4());
@@ -245,7 +300,17 @@ TEST(ContainerPackets, ofCAF)
     const CAF sound = cafOf(*source);
     const Bytes movie = readFile(aacInMP4());
     const auto descriptor = movie.begin() + static_cast<std::ptrdiff_t>(bodyOf(movie, "esds")) + 4;
-    const std::vector<std::size_t> threeSizes{100, 200, 20000};
+    // With these flags (ISO/IEC 14496-1: ES_Descriptor), and so many bytes for what they announce; the address has 3.
+    const auto fullDescriptor = [&](std::uint8_t flags, std::size_t more) {
+        Bytes cookie(descriptor, descriptor + 42);
+        cookie[4] = static_cast<std::byte>(std::to_integer<std::size_t>(cookie[4]) + more); // its size, of 4 bytes
+        cookie[7] = std::byte{flags};
+        Bytes fields(more);
+        if ((flags & 0x40) != 0)
+            fields[(flags & 0x80) != 0 ? 2 : 0] = std::byte{3};
+        cookie.insert(cookie.begin() + 8, fields.begin(), fields.end());
+        return cookie;
+    };
     const struct {
         const char* name;
         std::function<void(CAF&)> change;
@@ -255,6 +320,11 @@ TEST(ContainerPackets, ofCAF)
     } cases[] = {
         {"a bare configuration", [](CAF&) {}, 0, 21, 20000},
         {"a descriptor", [&](CAF& caf) { caf.cookie.assign(descriptor, descriptor + 42); }, 0, 21, 20000},
+        {"a descriptor with all that it may have", [&](CAF& caf) { caf.cookie = fullDescriptor(0xE0, 8); }, 0, 21,
+         20000},
+        {"a descriptor that depends on another", [&](CAF& caf) { caf.cookie = fullDescriptor(0x80, 2); }, 0, 21, 20000},
+        {"a descriptor with an address", [&](CAF& caf) { caf.cookie = fullDescriptor(0x40, 4); }, 0, 21, 20000},
+        {"a descriptor with a clock", [&](CAF& caf) { caf.cookie = fullDescriptor(0x20, 2); }, 0, 21, 20000},
         {"data cut short", [&](CAF& caf) { caf.data.resize(packets.size() - 1); }, 0, 20, 20 * 1024 - 1024},
         {"no table", [](CAF& caf) { caf.table.clear(); }, kStatusIOError},
         {"no cookie", [](CAF& caf) { caf.cookie.clear(); }, kStatusIOError},

@@ -198,6 +198,48 @@ TEST(AudioFileService, HostileFilesCostNothing)
     }
 }
 
+TEST(AudioFileService, CAFWhosePacketsHoldNoFramesHasNoFormat)
+{
+    TemporaryFolder folder;
+    Chunks chunks{formatChunk(fourCC("caff")), dataChunk(fourCC("caff"))};
+    chunks[0].second[23] = 0; // frames in a packet
+    const auto file = openAudio(folder.write("file", buildContainer(fourCC("caff"), chunks)));
+    ASSERT_NE(file, nullptr);
+    StreamDescription format;
+    EXPECT_EQ(file->dataFormat(format), kStatusIOError); // and nothing is divided by 0
+}
+
+// EBU Tech 3306: sizes of chunks beside "data", by their ids.
+TEST(AudioFileService, RF64SizesOfOtherChunksStandInATableOfThree)
+{
+    TemporaryFolder folder;
+    for (const std::uint32_t stated : {0u, 2u, 3u, 9u}) { // 9 are more than the chunk holds
+        const FourCC rf64 = fourCC("RF64");
+        Bytes bytes = buildContainer(rf64, {formatChunk(rf64), dataChunk(rf64), {fourCC("note"), "text"}});
+        Bytes table(3 * 12);
+        for (std::size_t i = 0; i < 3; ++i) {
+            storeBE(table.data() + 12 * i, i == 2 ? fourCC("note") : fourCC("none"));
+            storeLE(table.data() + 12 * i + 4, i == 2 ? std::uint64_t{4} : 1000);
+        }
+        storeLE(bytes.data() + bytes.size() - 8, 0xFFFFFFFFu);
+        storeLE(bytes.data() + 16, 28 + 36u);
+        storeLE(bytes.data() + 20, std::uint64_t{bytes.size() + 36 - 8});
+        storeLE(bytes.data() + 44, stated);
+        bytes.insert(bytes.begin() + 48, table.begin(), table.end());
+        Bytes more(8 + 6); // so that a size that is not found in the table is told from the end of the file
+        storeBE(more.data(), fourCC("more"));
+        storeLE(more.data() + 4, 6u);
+        bytes.insert(bytes.end(), more.begin(), more.end());
+        storeLE(bytes.data() + 20, std::uint64_t{bytes.size() - 8});
+        const auto file = openAudio(folder.write("file", bytes), false);
+        ASSERT_NE(file, nullptr);
+        EXPECT_EQ(itemsOf(*file, fourCC("more")).size(), stated >= 3 ? 1u : 0u) << stated;
+        if (stated >= 3) {
+            EXPECT_EQ(itemsOf(*file, fourCC("note")), std::vector<std::string>{"text"}) << stated;
+        }
+    }
+}
+
 TEST(AudioFileService, ManyTinyChunksAreScannedInLinearTime)
 {
     TemporaryFolder folder;

@@ -100,6 +100,42 @@ TEST(ConvertingReader, TakesALayoutOfTheClientsChannels)
     EXPECT_EQ(set(0, 0, 1, 11), AudioHandle::kBadPropertySize);
 }
 
+TEST(ConvertingReader, TellsSizesOfItsPropertiesAndWhichMayBeSet)
+{
+    const TemporaryFolder folder;
+    FakeDecoder::File coded{.validFrames = 900};
+    const FakeDecoder::Module module(coded);
+    const auto format = StreamDescription::packedPCM(44100, 1, {.bits = 16});
+    const auto linear = openReader(writeAudio(folder, fourCC("WAVE"), format, std::vector<std::int16_t>(8, 1)));
+    const auto decoded = openReader(folder.write("file", "coded"));
+    ASSERT_TRUE(linear && decoded);
+    const struct {
+        FourCC id;
+        std::uint32_t sizeOfLinear, sizeOfCoded; // 0: not supported
+        bool isWritable;
+    } cases[] = {
+        {ConvertingReader::fileFormatProperty, 40, 40, false}, {ConvertingReader::clientFormatProperty, 40, 40, true},
+        {ConvertingReader::frameCountProperty, 8, 8, false},   {ConvertingReader::audioFileProperty, 8, 8, false},
+        {ConvertingReader::packetTableProperty, 0, 16, false}, {fourCC("none"), 0, 0, false},
+    };
+    for (const auto& expected : cases)
+        for (ConvertingReader* reader : {linear.get(), decoded.get()}) {
+            const std::uint32_t there = reader == linear.get() ? expected.sizeOfLinear : expected.sizeOfCoded;
+            std::uint32_t size = 99;
+            bool isWritable = !expected.isWritable;
+            EXPECT_EQ(reader->propertyInfo(expected.id, size, isWritable),
+                      there > 0 ? kStatusOK : ConvertingReader::kPropertyNotSupported)
+                << fourCCText(expected.id);
+            EXPECT_EQ(size, there) << fourCCText(expected.id);
+            EXPECT_EQ(isWritable, expected.isWritable) << fourCCText(expected.id);
+        }
+    std::uint32_t size = 99;
+    bool isWritable = false;
+    EXPECT_EQ(linear->propertyInfo(ConvertingReader::clientLayoutProperty, size, isWritable), 0);
+    EXPECT_EQ(size, 0u); // none was set
+    EXPECT_TRUE(isWritable);
+}
+
 TEST(ConvertingReader, WidensSamplesOfOddBits)
 {
     const TemporaryFolder folder;

@@ -85,6 +85,20 @@ TEST(CFileServer, SharesOneReadingOfAFile)
     EXPECT_FALSE(server.GetFileInfo(nullptr).ref.IsValid());
 }
 
+TEST(CFileServer, ANewClientHasTheSmallestIdThatIsFree)
+{
+    const TemporaryFolder folder;
+    const CFileRef ref = writeMono(folder, "a.wav");
+    CFileServer server(10);
+    for (const unsigned int id : {3U, 2U}) // in any order
+        server.Register(id, &ref);
+    EXPECT_EQ(server.CreateNewClientId(), 1U);
+    server.Register(1, &ref);
+    EXPECT_EQ(server.CreateNewClientId(), 4U);
+    server.UnRegister(2);
+    EXPECT_EQ(server.CreateNewClientId(), 2U);
+}
+
 TEST(CFileServer, RefusalsAndFailures)
 {
     const TemporaryFolder folder;

@@ -20,6 +20,21 @@ TEST(AudioRepresentation, NothingComesOfWhatIsNoOverview)
         EXPECT_EQ(AudioRepresentation::initWithOverview(block, 44100), nullptr);
 }
 
+TEST(AudioRepresentation, OfAnOverviewHasItsPointsForTheOneChannel)
+{
+    const KTMem block = blockOf(300, {{-3, 64}, {-127, 127}});
+    const auto representation = AudioRepresentation::audioRepresentationWithOverview(&block, 48000);
+    ASSERT_NE(representation, nullptr);
+    EXPECT_EQ(representation->frames(), 300);
+    EXPECT_EQ(representation->sampleRate(), 48000);
+    ASSERT_EQ(representation->overviewBuffers().size(), 2u);
+    for (const auto& buffers : representation->overviewBuffers()) {
+        EXPECT_EQ(buffers.minima, (std::vector<float>{-3 / 128.F, -127 / 128.F}));
+        EXPECT_EQ(buffers.maxima, (std::vector<float>{64 / 128.F, 127 / 128.F}));
+    }
+    EXPECT_TRUE(representation->samples(0).empty());
+}
+
 TEST(AudioRepresentation, ReadsTheSamplesOfAFile)
 {
     const TemporaryFolder folder;

@@ -1,6 +1,7 @@
 #include "loops/overview/MDOverview.h"
 
 #include "OverviewImages.h"
+#include "support/FakeDecoder.h"
 #include "support/FaultInjection.h"
 #include "support/Media.h"
 #include "support/Programs.h"
@@ -98,6 +99,28 @@ TEST_F(CreateOverviewOfFile, AFileThatWasCutMeanwhileGivesNothing)
     std::filesystem::resize_file(path_, 3000000);
     EXPECT_EQ(file_.CreateOverview({}, &status_), nullptr);
     EXPECT_EQ(status_, kStatusEndOfFile);
+}
+
+TEST(CreateOverview, ACodedFileThatEndsEarlyIsDrawnAndOneThatBreaksIsNot)
+{
+    const TemporaryFolder folder;
+    const CFileRef ref(folder.write("a.ogg", "OggS, coded somehow").c_str(), false);
+    FakeDecoder::File coded{.formatId = fourCC("vorb"), .fileType = fourCC("OggS"), .frames = 20000};
+    const FakeDecoder::Module module(coded);
+    std::int32_t status = 1;
+    {
+        CAudioFileIO file(ref, 0);
+        coded.framesThere = 700;
+        const auto block = file.CreateOverview({}, &status);
+        ASSERT_NE(block, nullptr);
+        EXPECT_EQ(status, kStatusOK);
+        ASSERT_EQ(pointsOf(*block).size(), 3u);
+        EXPECT_EQ(pointsOf(*block)[2].second, 127);
+    }
+    CAudioFileIO file(ref, 0);
+    coded.broken = 600;
+    EXPECT_EQ(file.CreateOverview({}, &status), nullptr);
+    EXPECT_EQ(status, kStatusIOError);
 }
 
 // One sound, converted by other programs without a change of its samples.

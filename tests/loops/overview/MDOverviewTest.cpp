@@ -94,6 +94,12 @@ TEST(MDOverview, WhatIsBeyondTheBlockIsDropped)
     EXPECT_EQ(OverviewFrames(block), 2400u);
     EXPECT_EQ(block.size(), OverviewBlockSize(512));
 
+    // And what is left over of a block is given back.
+    KTMem large(OverviewBlockSize(1000));
+    MDOverview early(&large);
+    early.Add(samples.data(), 0, 300, 1, 1, 0);
+    EXPECT_EQ(early.Finalize()->size(), OverviewBlockSize(300));
+
     // By slices of 2,048: the second begins beyond.
     MDOverview sliced(&block);
     sliced.Add(floats.data(), 0, 5000, 1);
@@ -135,9 +141,9 @@ TEST(MDOverview, TheRoughPictureFollowsTheExactOneAndDecays)
     EXPECT_EQ(OverviewFrames(block), 512u);
 
     const std::vector<float> quiet(256, -0.9F); // only what is above zero counts
-    for (int call = 0; call < 15; ++call)
+    for (int call = 0; call < 16; ++call)
         overview.AddRough(quiet.data(), 256);
-    EXPECT_EQ(pointsOf(block)[15], (std::pair{-63, 63})); // the running peak
+    EXPECT_EQ(pointsOf(block)[16], (std::pair{-63, 63})); // the running peak
     EXPECT_EQ(pointsOf(block)[17], (std::pair{0, 0}));    // which the 17th call forgets
     const std::vector<float> loud(256 * 9, 7.0F);
     overview.AddRough(loud.data(), 256 * 9); // to the end of the block and no further

@@ -141,6 +141,7 @@ TEST_F(StoredOverview, PairsOfOtherLengthsBecomePoints)
         {"64: four pairs to a point", 300, "0000000000000040 ff000100 fe000100 ff000300 ff000200 f8000800", "fe03f808"},
         {"200: the second pair reaches into both points", 300, "00000000000000c8 ff000500 fb000100", "fb05fb01"},
         {"no pair", 300, "0000000000000100", "00000000"},
+        {"all above zero", 300, "0000000000000100 03000500 04000600", "03050406"},
         {"the last pair is missing", 300, "0000000000000100 ff000100", "ff010000"},
         {"more pairs than frames", 256, "0000000000000100 ff000100 80007f00", "ff01"},
         {"one pair of 2^31 - 1", 300, "000000007fffffff ff000100", "ff01ff01"},

@@ -8,5 +8,5 @@ find_package(ZLIB REQUIRED)
 find_package(Threads REQUIRED)
 
 # Decoders of compressed audio, in a module of their own; without these packages the library has none.
-pkg_check_modules(ffmpeg IMPORTED_TARGET libavformat libavcodec libswresample libavutil)
-option(KTFILES_WITH_FFMPEG "Build the decoder module" ${ffmpeg_FOUND})
+pkg_check_modules(decoding IMPORTED_TARGET libavformat libavcodec libswresample libavutil wavpack)
+option(KTFILES_WITH_FFMPEG "Build the decoder module" ${decoding_FOUND})

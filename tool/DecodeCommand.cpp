@@ -128,6 +128,8 @@ void declareDecode(CommandLine& commandLine)
                          "The file or folder to write to, \"-\" for standard output; else the current folder")
         ->option_text("OUT");
     addSoundOptions(verb, arguments.options.wishes);
+    verb.add_flag("--conceal", arguments.options.conceal,
+                  "Keep what a damaged file gives, with silence for the frames that cannot be decoded");
     verb.add_flag("--force", arguments.options.force, "Replace files that exist");
 }
 

@@ -96,6 +96,14 @@ void writeSound(DecodeSource& source, const DecodeFrame& frame, Target& target, 
     result.clippedSamples = source.clippedSamples();
 }
 
+/// What of the sound is not as it was made; empty where nothing is known to be.
+std::string damageTo(const DecodeSource& source)
+{
+    if (const std::uint64_t missing = source.missingFrames(); missing > 0)
+        return fmt::format("{} cannot be decoded", missing == 1 ? "1 frame" : fmt::format("{} frames", missing));
+    return source.isOtherThanItsChecksum() ? "the sound is not what its checksum says" : "";
+}
+
 void tell(const std::string& path, const std::string& note)
 {
     fmt::print(stderr, "ktfiles: {}: {}\n", printable(path), printable(note));
@@ -107,6 +115,8 @@ void tellAll(const std::string& path, const DecodeSource& source, const DecodeRe
         tell(path, note);
     if (result.sound.frames < source.sound().frames)
         tell(path, fmt::format("ends after {} of {} frames", result.sound.frames, source.sound().frames));
+    if (const std::string damage = damageTo(source); !damage.empty())
+        tell(path, damage + (result.missingFrames > 0 ? "; they are silent" : ""));
     if (result.clippedSamples > 0)
         tell(path, fmt::format("{} clipped; --bits f32 keeps what is beyond full scale",
                                result.clippedSamples == 1 ? "1 sample is"
@@ -123,13 +133,20 @@ DecodeResult decodeFile(const DecodeJob& job, const DecodeOptions& options)
     DecodeSource source(job.file, options.wishes);
     DecodeTags tags(job.file);
     const DecodeFrame frame(source.sound(), *options.wishes.format);
-    DecodeResult result{
-        .output = job.output, .container = frame.container(), .sound = source.sound(), .clippedSamples = 0, .tags = {}};
+    DecodeResult result{.output = job.output,
+                        .container = frame.container(),
+                        .sound = source.sound(),
+                        .clippedSamples = 0,
+                        .missingFrames = 0,
+                        .tags = {}};
     Target target(job, options.force);
     writeSound(source, frame, target, options.quiet, result);
     access.reset(); // ahead of the wait for others who have the output
     if (target.failed())
         return result;
+    result.missingFrames = source.missingFrames();
+    if (const std::string damage = damageTo(source); !damage.empty() && !options.conceal)
+        throw Failure(damage + "; --conceal takes it as it is");
     result.tags =
         tags.carryTo(target.regular() != nullptr ? target.regular()->path() : "", result.container, result.sound,
                      source.sourceRate(), source.isWhole() && result.sound.frames == source.sound().frames);

@@ -13,7 +13,8 @@ struct DecodeJob {
 
 struct DecodeOptions {
     DecodeWishes wishes;
-    bool force = false; // replace a file that exists
+    bool force = false;   // replace a file that exists
+    bool conceal = false; // take silence where the file is damaged
     bool quiet = false;
 };
 
@@ -22,6 +23,7 @@ struct DecodeResult {
     std::string container; // as DecodeFrame::container
     DecodedSound sound;    // with the frames that were written
     std::int64_t clippedSamples = 0;
+    std::uint64_t missingFrames = 0; // as DecodeSource::missingFrames
     CarriedTags tags;
 };
 

@@ -33,6 +33,7 @@ nlohmann::ordered_json asJson(const std::string& path, const DecodeResult& resul
                                 {"floatingPoint", sound.depth.isFloat},
                                 {"frames", sound.frames},
                                 {"clippedSamples", result.clippedSamples},
+                                {"missingFrames", result.missingFrames},
                                 {"tags", result.tags.keys}};
     if (!result.tags.notKept.empty())
         json["notKept"] = result.tags.notKept;

@@ -72,6 +72,7 @@ void DecodeSource::open(const std::string& path)
     reader_ = ConvertingReader::open(*coordinatedURL(path), &status, &error);
     if (!reader_)
         throw Failure(std::filesystem::file_size(path) == 0 ? "is empty" : error.description);
+    reader_->compareChecksum();
     sourceRate_ = reader_->clientFormat().sampleRate;
 }
 

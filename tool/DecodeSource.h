@@ -50,6 +50,11 @@ public:
     /// Samples so far that were beyond full scale, and stand at it now.
     std::int64_t clippedSamples() const { return clipped_; }
 
+    /// Of FILE's frames that were read, those that could not be decoded: silence stands for them.
+    std::uint64_t missingFrames() const { return reader_->missingFrames(); }
+    /// All of it was read, and it is not what FILE's checksum says.
+    bool isOtherThanItsChecksum() const { return reader_->checksum() == platform::ConvertingReader::Checksum::differs; }
+
 private:
     void open(const std::string& path);
     void lookInto(const std::string& path);

@@ -57,7 +57,7 @@ _ktfiles()
             tags/set | tags/remove | tags/copy) COMPREPLY=($(compgen -W "$edit $common" -- "$cur")) ;;
             overview/*) COMPREPLY=($(compgen -W "--png --svg --width --height --start --end --scale --colors --stored
                 --store $edit $common" -- "$cur")) ;;
-            decode/*) COMPREPLY=($(compgen -W "--output --format --rate --channels --bits --start --frames --force
+            decode/*) COMPREPLY=($(compgen -W "--output --format --rate --channels --bits --start --frames --conceal --force
                 $common" -- "$cur")) ;;
             lock/*) COMPREPLY=($(compgen -W "--read --write --presenter --timeout -- $common" -- "$cur")) ;;
             scan/*) COMPREPLY=($(compgen -W "--csv --threads $common" -- "$cur")) ;;

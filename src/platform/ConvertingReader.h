@@ -51,7 +51,7 @@ static_assert(sizeof(ChannelLayout) == 32);
 
 /// A file open for reading, with a place in it, a frame. Owns the file. Operations return 0 or a negative status; one
 /// that fails leaves the place where it was. Reading allocates nothing, except that a rate conversion may behind a
-/// seek. What is read at a place does not depend on how it was come to.
+/// seek, and whoever meets missing frames. What is read at a place does not depend on how it was come to.
 class KT_EXPORT ConvertingReader final : public AudioHandle {
 public:
     static constexpr std::int32_t kPropertyNotSupported = -66561;
@@ -61,8 +61,10 @@ public:
     static constexpr FourCC clientFormatProperty = fourCC("cfmt"); // StreamDescription; can be set
     static constexpr FourCC clientLayoutProperty = fourCC("cclo"); // ChannelLayout, of any length; can be set
     static constexpr FourCC frameCountProperty = fourCC("#frm");   // 64-bit, at the file's rate
-    static constexpr FourCC audioFileProperty = fourCC("afil");   // AudioHandle*, the reader's; null when there is none
-    static constexpr FourCC packetTableProperty = fourCC("xpti"); // PacketTable; not of linear PCM
+    static constexpr FourCC audioFileProperty = fourCC("afil"); // AudioHandle*, the reader's; null when there is none
+    static constexpr FourCC missingFramesProperty = fourCC("miss"); // 64-bit, missingFrames()
+    static constexpr FourCC checksumProperty = fourCC("csum");      // Checksum; set to any value, asks for it
+    static constexpr FourCC packetTableProperty = fourCC("xpti");   // PacketTable; not of linear PCM
 
     /// Null, with `*status` and `*error` (either may be null), when the file cannot be opened; kFormatNotSupported for
     /// audio that nothing here decodes, and then the error says what to install.
@@ -89,6 +91,16 @@ public:
     std::uint64_t frameCount() const;
     /// The frames that there are to read: at the client's rate those whose time is ahead of the file's end.
     std::uint64_t clientFrameCount() const;
+
+    /// Of the frames read so far, at the file's rate, those that the file does not hold or that cannot be decoded, as
+    /// where it is damaged: they were read as silence, so that all others are where they belong. Each counts once.
+    std::uint64_t missingFrames() const;
+    /// Whether the sound is what the file's own checksum says; `notCompared` before all of it was read in one run.
+    enum class Checksum : std::uint32_t { notCompared, same, differs };
+    Checksum checksum() const;
+    /// Asks for the comparison, which costs a hash of the sound: FLAC's MD5. Checksums of its parts (in FLAC, WavPack,
+    /// TTA and Ogg) are always compared, and parts that fail are missing.
+    void compareChecksum();
 
     /// At the client's rate. kStatusBeforeStart below 0; a place past the end is one where nothing is read.
     std::int32_t seek(std::int64_t frame);

@@ -196,6 +196,7 @@ TEST_P(Formats, HasTheFramesThatWentIn)
     const Bytes all = allFramesOf(*reader_, 4096);
     const std::uint32_t frameSize = reader_->clientFormat().bytesPerFrame;
     EXPECT_EQ(all.size() / frameSize, reader_->frameCount());
+    EXPECT_EQ(reader_->missingFrames(), 0u);
     EXPECT_TRUE(framesOf(*reader_, reader_->frameCount(), 10).empty());
     EXPECT_TRUE(framesOf(*reader_, reader_->frameCount() + (1u << 30), 10).empty());
     if (format.length == Length::kept) {

@@ -210,11 +210,30 @@ class Compressed(CommandTest):
             end = content.rindex(content[content.index(b"\xff\xfb" if codec == "lame" else b"\xff\xf8"):][:2])
             content[end:end + 40] = bytes(40)
             self.write("bad", content)
-            told = self.json("decode", "bad", "-o", "out.wav", "--force")[0]
+            told = self.json("decode", "bad", "-o", "out.wav", "--force", "--conceal")[0]
             self.assertLess(abs(told["frames"] - self.FRAMES), 6000)
             size, = struct.unpack_from("<I", (self.folder / "out.wav").read_bytes(), 4)
             self.assertEqual(size + 8, os.path.getsize(self.folder / "out.wav"))
             self.assertEqual(len(samples_of(self.folder / "out.wav")), told["frames"] * 2)
+
+    def test_missing_frames_fail_unless_concealed(self):
+        whole = samples_of(self.encode("whole.flac", "flac"))
+        content = bytearray((self.folder / "whole.flac").read_bytes())
+        middle = len(content) // 2
+        content[middle:middle + 40] = bytes(40)
+        self.write("bad.flac", content)
+        content = bytearray((self.folder / "whole.flac").read_bytes())
+        content[26] ^= 1  # of the MD5
+        self.write("other.flac", content)
+        for name, problem in (("bad.flac", "4608 frames cannot be decoded"),
+                              ("other.flac", "the sound is not what its checksum says")):
+            self.assertIn(f"ktfiles: {name}: {problem}; --conceal", self.failure("decode", name, "-o", "out.wav"))
+            self.assertFalse((self.folder / "out.wav").exists())
+            told = self.json("decode", name, "-o", "out.wav", "--conceal")[0]
+            self.assertEqual(told["missingFrames"], 4608 if name == "bad.flac" else 0)
+            different = sum(a != b for a, b in zip(samples_of(self.folder / "out.wav"), whole))
+            self.assertLessEqual(different, told["missingFrames"] * 2)
+            os.remove(self.folder / "out.wav")
 
     def test_speakers(self):
         for name, codec in (("a.flac", "flac"), ("a.m4a", "aac"), ("a.ac3", "ac3")):

@@ -27,6 +27,11 @@ public:
     virtual std::uint32_t speakers() const { return 0; }
     /// False when the format has none.
     virtual bool packetTable(PacketTable&) const { return false; }
+    /// Frames among those read so far for which the file has none that can be decoded: silence stands for them.
+    virtual std::uint64_t missingFrames() const { return 0; }
+    /// As ConvertingReader's.
+    virtual ConvertingReader::Checksum checksum() const { return ConvertingReader::Checksum::notCompared; }
+    virtual void compareChecksum() {}
     /// The file itself, which stays the decoder's: answers "ffmt" with its type code. Null when there is none.
     virtual AudioHandle* file() = 0;
 

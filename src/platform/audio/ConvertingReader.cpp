@@ -121,6 +121,21 @@ std::uint64_t ConvertingReader::frameCount() const
     return implementation_->decoder->frameCount();
 }
 
+std::uint64_t ConvertingReader::missingFrames() const
+{
+    return implementation_->decoder->missingFrames();
+}
+
+ConvertingReader::Checksum ConvertingReader::checksum() const
+{
+    return implementation_->decoder->checksum();
+}
+
+void ConvertingReader::compareChecksum()
+{
+    implementation_->decoder->compareChecksum();
+}
+
 std::uint64_t ConvertingReader::clientFrameCount() const
 {
     return implementation_->source().frameCount();
@@ -234,11 +249,12 @@ std::int32_t ConvertingReader::read(std::uint32_t& frames, std::span<AudioBuffer
 std::int32_t ConvertingReader::propertyInfo(FourCC id, std::uint32_t& size, bool& isWritable)
 {
     PacketTable table;
-    isWritable = id == clientFormatProperty || id == clientLayoutProperty;
-    size = id == fileFormatProperty || id == clientFormatProperty ? sizeof(StreamDescription)
+    isWritable = id == clientFormatProperty || id == clientLayoutProperty || id == checksumProperty;
+    size = id == checksumProperty                                   ? sizeof(Checksum)
+           : id == fileFormatProperty || id == clientFormatProperty ? sizeof(StreamDescription)
            : id == clientLayoutProperty ? static_cast<std::uint32_t>(implementation_->layout.size())
-           : id == frameCountProperty   ? sizeof(std::uint64_t)
-           : id == audioFileProperty    ? sizeof(AudioHandle*)
+           : id == frameCountProperty || id == missingFramesProperty                   ? sizeof(std::uint64_t)
+           : id == audioFileProperty                                                   ? sizeof(AudioHandle*)
            : id == packetTableProperty && implementation_->decoder->packetTable(table) ? sizeof table
                                                                                        : 0;
     return size > 0 || id == clientLayoutProperty ? kStatusOK : kPropertyNotSupported;
@@ -255,6 +271,10 @@ std::int32_t ConvertingReader::property(FourCC id, std::uint32_t& size, void* da
         return giveValue(clientFormat());
     case frameCountProperty:
         return giveValue(frameCount());
+    case checksumProperty:
+        return giveValue(checksum());
+    case missingFramesProperty:
+        return giveValue(missingFrames());
     case audioFileProperty:
         return giveValue(implementation_->decoder->file());
     case clientLayoutProperty: {
@@ -273,6 +293,10 @@ std::int32_t ConvertingReader::property(FourCC id, std::uint32_t& size, void* da
 
 std::int32_t ConvertingReader::setProperty(FourCC id, std::uint32_t size, const void* data)
 {
+    if (id == checksumProperty) {
+        compareChecksum();
+        return kStatusOK;
+    }
     if (id != clientFormatProperty && id != clientLayoutProperty)
         return kPropertyNotSupported;
     if (data == nullptr)

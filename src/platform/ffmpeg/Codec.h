@@ -4,6 +4,7 @@
 #include "platform/ffmpeg/Handles.h"
 
 #include <cstdint>
+#include <memory>
 
 namespace platform::ffmpeg {
 
@@ -13,25 +14,28 @@ public:
     /// Whether frames that a stream marks as padding come out too.
     enum class Padding { kept, dropped };
 
-    /// Of packets whose times are in `numerator / denominator` seconds; 0 / 1 leaves them as they are. Without a
-    /// decoder for the coding isOpen() is false afterwards, with the status.
-    Codec(const AVCodecParameters& parameters, int numerator, int denominator, Padding padding, std::int32_t& status);
+    /// Of packets whose times are in `numerator / denominator` seconds; 0 / 1 leaves them as they are. Null, with the
+    /// status, without a decoder for the coding.
+    static std::unique_ptr<Codec> open(const AVCodecParameters& parameters, int numerator, int denominator,
+                                       Padding padding, std::int32_t& status);
 
-    bool isOpen() const { return context_ != nullptr; }
-    const AVCodecContext& context() const { return *context_; }
-    const AVFrame& frame() const { return *frame_; }
+    Codec() = default;
+    virtual ~Codec() = default;
+    Codec(const Codec&) = delete;
+    Codec& operator=(const Codec&) = delete;
+
+    virtual const AVFrame& frame() const = 0;
+    /// Bits of a sample ahead of coding; 0 where that is not known.
+    virtual int sourceBits() const = 0;
 
     enum class Result { frame, needsPacket, end, failed };
     /// The next frame of the packets sent. After `failed`, which is one packet's, it goes on.
-    Result receive();
-    /// Null: no packet follows. A packet that cannot be decoded is passed over. False only when memory is short.
-    bool send(const AVPacket* packet);
+    virtual Result receive() = 0;
+    enum class Sent { taken, failed, outOfMemory };
+    /// Null: no packet follows. A packet that cannot be decoded has failed here or in receive().
+    virtual Sent send(const AVPacket* packet) = 0;
     /// Forgets everything sent.
-    void flush();
-
-private:
-    CodecContext context_;
-    Frame frame_;
+    virtual void flush() = 0;
 };
 
 } // namespace platform::ffmpeg

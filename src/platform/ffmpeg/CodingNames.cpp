@@ -137,11 +137,12 @@ std::uint64_t framesOfBlocks(const AVCodecParameters& parameters, int bytes)
     return frames > 0 ? static_cast<std::uint64_t>(frames) : 0;
 }
 
-StreamDescription fileFormatOf(const AVCodecParameters& parameters, const AVCodecContext& codec, double sampleRate)
+StreamDescription fileFormatOf(const AVCodecParameters& parameters, int sourceBits, double sampleRate,
+                               std::uint32_t channels)
 {
     StreamDescription format;
     format.sampleRate = sampleRate;
-    format.channelsPerFrame = static_cast<std::uint32_t>(codec.ch_layout.nb_channels);
+    format.channelsPerFrame = channels;
     if (isLinearPCM(parameters.codec_id)) {
         setLinearPCM(format, parameters.codec_id);
         return format;
@@ -161,7 +162,7 @@ StreamDescription fileFormatOf(const AVCodecParameters& parameters, const AVCode
         const AVCodecDescriptor* descriptor = avcodec_descriptor_get(parameters.codec_id);
         const bool isLossless = descriptor != nullptr && (descriptor->props & AV_CODEC_PROP_LOSSLESS) != 0;
         format.framesPerPacket = static_cast<std::uint32_t>(std::max(parameters.frame_size, 0));
-        format.bitsPerChannel = isLossless ? static_cast<std::uint32_t>(std::max(codec.bits_per_raw_sample, 0)) : 0u;
+        format.bitsPerChannel = isLossless ? static_cast<std::uint32_t>(std::max(sourceBits, 0)) : 0u;
     }
     return format;
 }

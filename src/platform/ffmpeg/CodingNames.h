@@ -5,7 +5,6 @@
 
 #include <string_view>
 
-struct AVCodecContext;
 struct AVCodecParameters;
 
 namespace platform::ffmpeg {
@@ -13,8 +12,9 @@ namespace platform::ffmpeg {
 /// FFmpeg's number of a coding whose packets the library finds itself; 0 when there is none.
 int codecIdOf(FourCC formatId);
 
-/// How a stream's audio is coded, at `sampleRate`. `codec` has decoded some of it.
-StreamDescription fileFormatOf(const AVCodecParameters& parameters, const AVCodecContext& codec, double sampleRate);
+/// How a stream's audio is coded, of samples of `sourceBits` bits (0 where that is not known).
+StreamDescription fileFormatOf(const AVCodecParameters& parameters, int sourceBits, double sampleRate,
+                               std::uint32_t channels);
 
 /// The frames of one packet of `bytes` bytes, for codings whose blocks are all of one size and say nothing of each
 /// other; else 0.

@@ -4,7 +4,9 @@
 #include "platform/core/Status.h"
 #include "platform/ffmpeg/CodingNames.h"
 
+#include <cstddef>
 #include <new>
+#include <vector>
 
 extern "C" {
 #include <libavformat/avformat.h>
@@ -28,6 +30,36 @@ bool isCredible(const AVFormatContext& context, const std::string& url)
            (context.iformat->extensions != nullptr && av_match_ext(url.c_str(), context.iformat->extensions) != 0);
 }
 
+/// A context without a word: the log raises a message's level by the number that the class of its context points to,
+/// which of demultiplexers is none; here it is what `opaque` holds. The level itself is the host's.
+AVFormatContext* makeSilentContext()
+{
+    static const AVClass silent = [] {
+        AVClass made = *avformat_get_class();
+        made.log_level_offset_offset = offsetof(AVFormatContext, opaque);
+        return made;
+    }();
+    AVFormatContext* const context = avformat_alloc_context();
+    if (context == nullptr)
+        throw std::bad_alloc();
+    context->av_class = &silent;
+    context->opaque = reinterpret_cast<void*>(std::intptr_t{kLogLevelOffset});
+    return context;
+}
+
+/// avformat_find_stream_info, with silent decoders for the streams that are known by now.
+int findStreamInfo(AVFormatContext& context)
+{
+    std::vector<AVDictionary*> options(context.nb_streams);
+    bool isSet = true;
+    for (AVDictionary*& ofStream : options)
+        isSet = isSet && av_dict_set_int(&ofStream, "log_level_offset", kLogLevelOffset, 0) >= 0;
+    const int result = isSet ? avformat_find_stream_info(&context, options.data()) : AVERROR(ENOMEM);
+    for (AVDictionary*& ofStream : options)
+        av_dict_free(&ofStream);
+    return result;
+}
+
 } // namespace
 
 Demuxer::Demuxer(const char* path, std::int32_t& status) : url_(std::string("file:") + path)
@@ -38,11 +70,12 @@ Demuxer::Demuxer(const char* path, std::int32_t& status) : url_(std::string("fil
 std::int32_t Demuxer::open()
 {
     context_.reset();
-    AVFormatContext* context = nullptr;
+    FormatContext made(makeSilentContext());
     AVDictionary* options = nullptr;
     if (av_dict_set(&options, "protocol_whitelist", "file", 0) < 0 ||
         av_dict_set(&options, "format_whitelist", usedDemuxers, 0) < 0)
         throw std::bad_alloc();
+    AVFormatContext* context = made.release(); // which is freed when it cannot be opened
     int result = avformat_open_input(&context, url_.c_str(), nullptr, &options);
     av_dict_free(&options);
     if (result < 0)
@@ -50,7 +83,7 @@ std::int32_t Demuxer::open()
     FormatContext opened(context);
     if (!isCredible(*opened, url_))
         return AudioHandle::kFormatNotSupported;
-    result = avformat_find_stream_info(opened.get(), nullptr);
+    result = findStreamInfo(*opened);
     if (result < 0)
         return statusOf(result);
     stream_ = av_find_best_stream(opened.get(), AVMEDIA_TYPE_AUDIO, -1, -1, nullptr, 0);

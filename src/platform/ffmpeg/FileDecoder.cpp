@@ -19,7 +19,7 @@ namespace platform::ffmpeg {
 namespace {
 
 /// For codings that build on what went before; 13 packets of MP3, four times what Opus asks for.
-constexpr std::uint64_t kWarmUp = 16384;
+constexpr std::uint64_t kWarmUp = 16384, kOpusWarmUp = 96000;
 /// Decoding so far costs less than finding a place in a file.
 constexpr std::uint64_t kReach = 32768;
 /// More than any coding makes of one byte: FLAC has 16 bytes and more for at most 65,535 frames.
@@ -69,14 +69,18 @@ std::unique_ptr<FileDecoder> FileDecoder::open(const char* path, std::int32_t& s
     Demuxer demuxer(path, status);
     if (!demuxer.isOpen())
         return nullptr;
-    std::unique_ptr<FileDecoder> decoder(new FileDecoder(std::move(demuxer)));
+    std::unique_ptr<CorrectionFile> corrections = CorrectionFile::beside(path, demuxer);
+    std::unique_ptr<FileDecoder> decoder(new FileDecoder(std::move(demuxer), std::move(corrections)));
     status = decoder->begin();
     if (status == kStatusOK)
         status = decoder->describeAsDecoded();
     return status == kStatusOK ? std::move(decoder) : nullptr;
 }
 
-FileDecoder::FileDecoder(Demuxer demuxer) : demuxer_(std::move(demuxer)), packet_(makePacket())
+FileDecoder::FileDecoder(Demuxer demuxer, std::unique_ptr<CorrectionFile> corrections)
+    : demuxer_(std::move(demuxer)),
+      corrections_(std::move(corrections)),
+      packet_(makePacket())
 {
     const AVCodecParameters& parameters = *demuxer_.stream().codecpar;
     framesPerBlock_ = isOneRun(demuxer_) ? framesPerBlockOf(parameters) : 0;
@@ -85,7 +89,7 @@ FileDecoder::FileDecoder(Demuxer demuxer) : demuxer_(std::move(demuxer)), packet
     endsWithTime_ = isPaged_ && parameters.codec_id == AV_CODEC_ID_VORBIS;
     // The low bits of "ima4" run on from the first packet to the last.
     isChained_ = parameters.codec_id == AV_CODEC_ID_ADPCM_IMA_QT;
-    warmUp_ = isIndependent(parameters) ? 0 : kWarmUp;
+    warmUp_ = isIndependent(parameters) ? 0 : parameters.codec_id == AV_CODEC_ID_OPUS ? kOpusWarmUp : kWarmUp;
 }
 
 /// Everything as at the first packet, the decoder too, whatever it keeps when it is flushed.
@@ -93,8 +97,8 @@ std::int32_t FileDecoder::begin()
 {
     const AVRational unit = numbers_ == Numbers::byTime ? demuxer_.stream().time_base : AVRational{0, 1};
     std::int32_t status = kStatusOK;
-    codec_.emplace(*demuxer_.stream().codecpar, unit.num, unit.den,
-                   endsWithTime_ ? Codec::Padding::kept : Codec::Padding::dropped, status);
+    codec_ = Codec::open(*demuxer_.stream().codecpar, unit.num, unit.den,
+                         endsWithTime_ ? Codec::Padding::kept : Codec::Padding::dropped, status);
     expected_ = 0;
     isNumbered_ = true;
     hasGivenUp_ = false;
@@ -106,6 +110,8 @@ std::int32_t FileDecoder::restart()
 {
     codec_.reset();
     const std::int32_t status = demuxer_.restart();
+    if (corrections_)
+        corrections_->seek(0);
     return status == kStatusOK ? begin() : status;
 }
 
@@ -118,12 +124,13 @@ std::int32_t FileDecoder::describeAsDecoded()
         return status;
     if (span.start == kNever)
         return kStatusIOError;
-    const auto frames = frameFormatOf(codec_->context(), decoded());
+    const auto frames = frameFormatOf(codec_->sourceBits(), decoded());
     if (!frames)
         return AudioHandle::kFormatNotSupported;
     noteSpeakers();
     const AVCodecParameters& parameters = *demuxer_.stream().codecpar;
-    const StreamDescription file = fileFormatOf(parameters, codec_->context(), frames->sampleRate);
+    const StreamDescription file =
+        fileFormatOf(parameters, codec_->sourceBits(), frames->sampleRate, frames->channelsPerFrame);
     if (numbers_ == Numbers::byTime && decoded().sample_rate != parameters.sample_rate)
         numbers_ = Numbers::byCount;
     const FourCC fileType = fileTypeOf(demuxer_.name(), demuxer_.brand());
@@ -134,6 +141,8 @@ std::int32_t FileDecoder::describeAsDecoded()
     if (status = restart(); status != kStatusOK)
         return status;
     describe(fileType, file, *frames, 0, count, FileHandle::unknownCount);
+    if (const auto stated = SoundDigest::statedBy(*demuxer_.stream().codecpar)) // of the file opened again
+        noteChecksum(*stated, file.bitsPerChannel);
     forget();
     return kStatusOK;
 }
@@ -200,7 +209,7 @@ std::uint64_t FileDecoder::reach(std::uint64_t)
 std::int32_t FileDecoder::startAt(std::uint64_t& number)
 {
     constexpr int attempts = 5;
-    const bool isWhole = demuxer_.isOpen() && codec_ && codec_->isOpen(); // unless starting anew failed
+    const bool isWhole = demuxer_.isOpen() && codec_; // unless starting anew failed
     bool hasLanded = isWhole && numbers_ == Numbers::byCount && landAtCheckpoint(number);
     const int tries = !isWhole || !canLand() || isChained_ ? 0 : attempts;
     std::uint64_t back = warmUp_;
@@ -234,6 +243,8 @@ bool FileDecoder::land(std::uint64_t number, std::uint64_t back)
     pending_.reset();
     if (!demuxer_.seek(timeOf(number - back)))
         return false;
+    if (corrections_)
+        corrections_->seek(timeOf(number - back));
     codec_->flush();
     isNumbered_ = hasGivenUp_ = false;
     page_ = -1;
@@ -302,7 +313,8 @@ std::int32_t FileDecoder::decodeNext(Span& span)
             if (!isNumbered_ || frame.nb_samples <= 0)
                 break;
             span.start = isTold ? told : expected_;
-            span.end = expected_ = span.start + static_cast<std::uint64_t>(frame.nb_samples);
+            length_ = static_cast<std::uint64_t>(frame.nb_samples);
+            span.end = expected_ = span.start + length_;
             return kStatusOK;
         }
         case Codec::Result::needsPacket:
@@ -315,20 +327,32 @@ std::int32_t FileDecoder::decodeNext(Span& span)
             span = {kNever, kNever};
             return kStatusOK;
         case Codec::Result::failed:
+            passOver();
             break;
         }
     }
+}
+
+/// A packet has failed: where frames are counted, as many as the last one gave are missing.
+void FileDecoder::passOver()
+{
+    if (numbers_ == Numbers::byCount && isNumbered_ && expected_ > 0)
+        expected_ += length_;
 }
 
 std::int32_t FileDecoder::sendPacket()
 {
     std::int32_t status = kStatusOK;
     if (!demuxer_.read(*packet_, status))
-        return status != kStatusOK || codec_->send(nullptr) ? status : kStatusOutOfMemory;
+        return status != kStatusOK || codec_->send(nullptr) != Codec::Sent::outOfMemory ? status : kStatusOutOfMemory;
+    if (corrections_)
+        corrections_->attachTo(*packet_);
     numberPacket();
-    const bool isSent = codec_->send(packet_.get());
+    const Codec::Sent sent = codec_->send(packet_.get());
+    if (sent == Codec::Sent::failed)
+        passOver();
     av_packet_unref(packet_.get());
-    return isSent ? kStatusOK : kStatusOutOfMemory;
+    return sent != Codec::Sent::outOfMemory ? kStatusOK : kStatusOutOfMemory;
 }
 
 /// What the packet at hand tells of the numbers of its frames.
@@ -373,7 +397,6 @@ void FileDecoder::numberPacket()
 
 std::unique_ptr<AudioDecoder> openFile(const char* path, std::int32_t& status)
 {
-    quietLog();
     return FileDecoder::open(path, status);
 }
 

@@ -3,6 +3,7 @@
 
 #include "platform/ffmpeg/Checkpoints.h"
 #include "platform/ffmpeg/Codec.h"
+#include "platform/ffmpeg/CorrectionFile.h"
 #include "platform/ffmpeg/Demuxer.h"
 #include "platform/ffmpeg/SpanDecoder.h"
 
@@ -23,7 +24,7 @@ private:
         byCount,    // what was decoded from the start on
     };
 
-    FileDecoder(Demuxer demuxer);
+    FileDecoder(Demuxer demuxer, std::unique_ptr<CorrectionFile> corrections);
     std::int32_t begin();
     std::int32_t describeAsDecoded();
     std::int32_t countFrames(std::uint64_t& count);
@@ -38,6 +39,7 @@ private:
     bool tellsNumber(const AVFrame& frame) const;
     std::int32_t sendPacket();
     void numberPacket();
+    void passOver();
 
     std::int32_t next(Span& span) override;
     std::int32_t startAt(std::uint64_t& number) override;
@@ -45,7 +47,8 @@ private:
     const AVFrame& decoded() const override { return codec_->frame(); }
 
     Demuxer demuxer_;
-    std::optional<Codec> codec_;
+    std::unique_ptr<CorrectionFile> corrections_; // null when there are none
+    std::unique_ptr<Codec> codec_;
     Packet packet_;
     Numbers numbers_ = Numbers::byCount;
     std::int64_t base_ = 0;            // the time, or the position, of number 0
@@ -57,6 +60,7 @@ private:
     std::uint64_t warmUp_ = 0;         // frames to decode and drop ahead of one
     std::uint64_t limit_ = kNever;     // no frame lies there or behind
     std::uint64_t expected_ = 0;       // the number of the next frame where nothing else tells it
+    std::uint64_t length_ = 0;         // of the last span
     bool isNumbered_ = true;           // `expected_` holds; else frames are dropped
     std::optional<Span> pending_;      // decoded, and to be handed out next
     Checkpoints checkpoints_;

@@ -101,9 +101,9 @@ StreamDescription nativePCM(double sampleRate, std::uint32_t channels, SampleFor
     return format;
 }
 
-std::optional<StreamDescription> frameFormatOf(const AVCodecContext& codec, const AVFrame& frame)
+std::optional<StreamDescription> frameFormatOf(int sourceBits, const AVFrame& frame)
 {
-    const SampleFormat sample = sampleFormatOf(static_cast<AVSampleFormat>(frame.format), codec.bits_per_raw_sample);
+    const SampleFormat sample = sampleFormatOf(static_cast<AVSampleFormat>(frame.format), sourceBits);
     if (sample.bits == 0 || frame.ch_layout.nb_channels < 1 || frame.sample_rate < 1)
         return std::nullopt;
     return nativePCM(frame.sample_rate, static_cast<std::uint32_t>(frame.ch_layout.nb_channels), sample);

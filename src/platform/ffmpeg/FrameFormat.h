@@ -7,7 +7,6 @@
 #include <cstdint>
 #include <optional>
 
-struct AVCodecContext;
 struct AVFrame;
 
 namespace platform::ffmpeg {
@@ -16,8 +15,8 @@ namespace platform::ffmpeg {
 StreamDescription nativePCM(double sampleRate, std::uint32_t channels, SampleFormat sample);
 
 /// What frames of a decoder are handed out in: floats where it gives floats, else integers of 16, 24 or 32 bits, as
-/// many as the source has. Nothing when the decoder's samples are of no such kind.
-std::optional<StreamDescription> frameFormatOf(const AVCodecContext& codec, const AVFrame& frame);
+/// many as the source has, `sourceBits` if that is known. Nothing when the decoder's samples are of no such kind.
+std::optional<StreamDescription> frameFormatOf(int sourceBits, const AVFrame& frame);
 
 /// As AudioDecoder::speakers().
 std::uint32_t speakersOf(const AVFrame& frame);

@@ -61,16 +61,4 @@ Packet makePacket()
     return allocated<Packet>(av_packet_alloc());
 }
 
-void quietLog()
-{
-    // A callback of the host's own gets messages whatever the level; a level other than the one that libraries begin
-    // with is the host's choice.
-    static const bool isDone = [] {
-        if (av_log_get_level() == AV_LOG_INFO)
-            av_log_set_level(AV_LOG_QUIET);
-        return true;
-    }();
-    static_cast<void>(isDone);
-}
-
 } // namespace platform::ffmpeg

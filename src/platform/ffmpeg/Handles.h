@@ -25,12 +25,13 @@ using FormatContext = std::unique_ptr<AVFormatContext, Release>;
 using Frame = std::unique_ptr<AVFrame, Release>;
 using Packet = std::unique_ptr<AVPacket, Release>;
 
+/// Takes a message of a context beyond every level: a host may show what its own contexts say. The log looks at the low
+/// 8 bits.
+constexpr int kLogLevelOffset = 128;
+
 // These throw std::bad_alloc.
 CodecParameters makeCodecParameters();
 Frame makeFrame();
 Packet makePacket();
-
-/// Keeps messages off standard error, as far as the process has set no level of its own; the first call does it.
-void quietLog();
 
 } // namespace platform::ffmpeg

@@ -52,9 +52,9 @@ CodecParameters parametersOf(PacketSource& source)
     return parameters;
 }
 
-Codec openCodec(const AVCodecParameters& parameters, std::int32_t& status)
+std::unique_ptr<Codec> openCodec(const AVCodecParameters& parameters, std::int32_t& status)
 {
-    return Codec(parameters, 0, 1, Codec::Padding::kept, status);
+    return Codec::open(parameters, 0, 1, Codec::Padding::kept, status);
 }
 
 } // namespace
@@ -70,8 +70,8 @@ std::unique_ptr<PacketDecoder> PacketDecoder::open(std::unique_ptr<PacketSource>
     const bool isSound = source->format().channelsPerFrame > 0 && framesPerPacket > 0 && framesPerPacket < 1u << 20 &&
                          table.validFrames >= 0 && table.primingFrames >= 0 &&
                          source->packetCount() < std::uint64_t{1} << 40;
-    Codec codec = openCodec(*parameters, status);
-    if (!codec.isOpen())
+    std::unique_ptr<Codec> codec = openCodec(*parameters, status);
+    if (!codec)
         return nullptr;
     status = kStatusIOError;
     if (!isSound)
@@ -82,7 +82,8 @@ std::unique_ptr<PacketDecoder> PacketDecoder::open(std::unique_ptr<PacketSource>
     return status == kStatusOK ? std::move(decoder) : nullptr;
 }
 
-PacketDecoder::PacketDecoder(std::unique_ptr<PacketSource> source, CodecParameters parameters, Codec codec)
+PacketDecoder::PacketDecoder(std::unique_ptr<PacketSource> source, CodecParameters parameters,
+                             std::unique_ptr<Codec> codec)
     : source_(std::move(source)),
       parameters_(std::move(parameters)),
       codec_(std::move(codec)),
@@ -103,7 +104,7 @@ std::int32_t PacketDecoder::describeAsDecoded()
             return status;
         if (span.start == kNever)
             return kStatusIOError;
-        const auto found = frameFormatOf(codec_.context(), decoded());
+        const auto found = frameFormatOf(codec_->sourceBits(), decoded());
         if (!found)
             return AudioHandle::kFormatNotSupported;
         noteSpeakers();
@@ -136,10 +137,10 @@ std::int32_t PacketDecoder::startAt(std::uint64_t& number)
     sent_ = awaited_ = packet < source_->packetCount() ? packet - std::min(source_->preRoll(packet), packet) : packet;
     number = std::min(number, awaited_ * framesPerPacket_);
     // Nothing is dropped ahead of the first packet, and a flushed decoder still knows the shape of its last window.
-    if (awaited_ == 0 || !codec_.isOpen())
+    if (awaited_ == 0 || !codec_)
         codec_ = openCodec(*parameters_, status);
     else
-        codec_.flush();
+        codec_->flush();
     return status;
 }
 
@@ -155,7 +156,7 @@ std::int32_t PacketDecoder::sendPacket()
     if (sent_ < source_->packetCount())
         status = source_->read(sent_, bytes_);
     if (status == kStatusEndOfFile)
-        return codec_.send(nullptr) ? kStatusOK : kStatusOutOfMemory;
+        return codec_->send(nullptr) != Codec::Sent::outOfMemory ? kStatusOK : kStatusOutOfMemory;
     if (status != kStatusOK)
         return status;
     const std::size_t size = bytes_.size();
@@ -168,13 +169,13 @@ std::int32_t PacketDecoder::sendPacket()
     packet_->size = static_cast<int>(size);
     packet_->pts = packet_->dts = pts;
     packet_->flags = AV_PKT_FLAG_KEY;
-    return codec_.send(packet_.get()) ? kStatusOK : kStatusOutOfMemory;
+    return codec_->send(packet_.get()) != Codec::Sent::outOfMemory ? kStatusOK : kStatusOutOfMemory;
 }
 
 std::int32_t PacketDecoder::next(Span& span)
 {
     for (;;) {
-        switch (codec_.receive()) {
+        switch (codec_->receive()) {
         case Codec::Result::frame: {
             const AVFrame& frame = decoded();
             const bool isNew =
@@ -203,7 +204,6 @@ std::int32_t PacketDecoder::next(Span& span)
 
 std::unique_ptr<AudioDecoder> openPackets(std::unique_ptr<PacketSource> source, std::int32_t& status)
 {
-    quietLog();
     return PacketDecoder::open(std::move(source), status);
 }
 

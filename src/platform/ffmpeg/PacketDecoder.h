@@ -18,18 +18,18 @@ public:
     bool packetTable(PacketTable& table) const override;
 
 private:
-    PacketDecoder(std::unique_ptr<PacketSource> source, CodecParameters parameters, Codec codec);
+    PacketDecoder(std::unique_ptr<PacketSource> source, CodecParameters parameters, std::unique_ptr<Codec> codec);
     std::int32_t describeAsDecoded();
     std::int32_t next(Span& span) override;
     std::int32_t startAt(std::uint64_t& number) override;
     std::uint64_t reach(std::uint64_t number) override;
-    const AVFrame& decoded() const override { return codec_.frame(); }
+    const AVFrame& decoded() const override { return codec_->frame(); }
     std::int32_t sendPacket();
     std::uint64_t packetOf(std::uint64_t number) const;
 
     std::unique_ptr<PacketSource> source_;
     CodecParameters parameters_;
-    Codec codec_;
+    std::unique_ptr<Codec> codec_;
     Packet packet_;
     Bytes bytes_;
     PacketTable table_;

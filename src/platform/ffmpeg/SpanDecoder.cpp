@@ -19,6 +19,18 @@ void SpanDecoder::describe(FourCC fileType, const StreamDescription& fileFormat,
     frameCount_ = frameCount;
 }
 
+void SpanDecoder::noteChecksum(const SoundDigest::Value& stated, std::uint32_t bits)
+{
+    stated_ = stated;
+    statedBits_ = bits;
+}
+
+void SpanDecoder::compareChecksum()
+{
+    if (stated_ && statedBits_ > 0 && statedBits_ <= frameFormat_.bitsPerChannel && !digest_)
+        digest_.emplace(*stated_, frameFormat_, statedBits_);
+}
+
 void SpanDecoder::noteSpeakers()
 {
     speakers_ = speakersOf(decoded());
@@ -43,13 +55,17 @@ std::int32_t SpanDecoder::read(std::uint32_t& frames, void* to)
         }
         const bool isSilent = number < held_.start;
         const std::uint64_t run = std::min((isSilent ? held_.start : held_.end) - number, wanted - done);
-        if (isSilent)
+        if (isSilent) {
             std::memset(at, 0, run * frameFormat_.bytesPerFrame);
-        else
+            missing_.add(frame_ + done, frame_ + done + run);
+        } else {
             interleave(decoded(), number - held_.start, run, frameFormat_, at);
+        }
         at += run * frameFormat_.bytesPerFrame;
         done += run;
     }
+    if (digest_)
+        digest_->add(frame_, static_cast<const std::byte*>(to), wanted);
     frame_ += wanted;
     frames = static_cast<std::uint32_t>(wanted);
     return kStatusOK;

@@ -4,6 +4,8 @@
 
 #include "platform/audio/AudioDecoder.h"
 #include "platform/ffmpeg/FileHandle.h"
+#include "platform/ffmpeg/FrameSpans.h"
+#include "platform/ffmpeg/SoundDigest.h"
 
 #include <cstddef>
 #include <optional>
@@ -18,6 +20,12 @@ public:
     const StreamDescription& frameFormat() const override { return frameFormat_; }
     std::uint32_t speakers() const override { return speakers_; }
     std::uint64_t frameCount() const override { return frameCount_; }
+    std::uint64_t missingFrames() const override { return missing_.count(); }
+    ConvertingReader::Checksum checksum() const override
+    {
+        return digest_ ? digest_->compare(frameCount_) : ConvertingReader::Checksum::notCompared;
+    }
+    void compareChecksum() override;
     AudioHandle* file() override { return handle_ ? &*handle_ : nullptr; }
     std::int32_t seek(std::uint64_t frame) override;
     std::int32_t read(std::uint32_t& frames, void* to) override;
@@ -42,6 +50,8 @@ protected:
     /// sound.
     void describe(FourCC fileType, const StreamDescription& fileFormat, const StreamDescription& frameFormat,
                   std::uint64_t first, std::uint64_t frameCount, std::uint64_t packetCount);
+    /// What the file says of all its sound, samples of `bits` bits.
+    void noteChecksum(const SoundDigest::Value& stated, std::uint32_t bits);
     /// The frames in decoded() say which speakers the channels feed.
     void noteSpeakers();
     /// What is decoded is no longer there.
@@ -60,6 +70,10 @@ private:
     Span held_;
     std::uint64_t silentFrom_ = 0;
     bool isLost_ = true;
+    std::optional<SoundDigest::Value> stated_;
+    std::uint32_t statedBits_ = 0;
+    std::optional<SoundDigest> digest_;
+    FrameSpans missing_; // that were read as silence
 };
 
 } // namespace platform::ffmpeg

@@ -18,6 +18,7 @@
 #include <chrono>
 #include <csignal>
 #include <filesystem>
+#include <fstream>
 #include <random>
 #include <thread>
 
@@ -453,14 +454,22 @@ TEST_F(CFileIOTest, TheWriterOfAFIFOIsLeftWaiting)
     const std::string path = folder / "fifo.mp3";
     ASSERT_EQ(mkfifo(path.c_str(), 0600), 0);
     std::atomic<bool> isOpen = false;
+    std::atomic<pid_t> task = 0;
     std::thread writer([&] {
+        task = gettid();
         close(open(path.c_str(), O_WRONLY | O_CLOEXEC));
         isOpen = true;
     });
-    std::this_thread::sleep_for(std::chrono::milliseconds(20)); // until it waits
+    const auto waits = [&task] { // its state, behind its name: asleep
+        std::string stat;
+        std::getline(std::ifstream("/proc/self/task/" + std::to_string(task) + "/stat"), stat);
+        return stat.find(") S ") != stat.npos;
+    };
+    while (task == 0 || !waits())
+        std::this_thread::sleep_for(std::chrono::milliseconds(10));
     CFileIO io;
     EXPECT_EQ(io.Open(fileRef(path), 0), kStatusNotAFile);
-    std::this_thread::sleep_for(std::chrono::milliseconds(20));
+    std::this_thread::sleep_for(std::chrono::milliseconds(100));
     EXPECT_FALSE(isOpen);
     close(open(path.c_str(), O_RDWR | O_CLOEXEC));
     writer.join();

@@ -324,11 +324,11 @@ class Check(CommandTest):
         times = ('rtime="00:00:01" duration="00:00:01.00000"', 'rtime="1.5"', 'rtime=""', 'rtime="00:00:00.10000S48000"')
         self.assertEqual(self.problems(document(
             audio_object("AO_1001"), audio_object("AO_1001", more='start="soon"'),
-            channel(*(block(i % 3, FRONT, times=time) for i, time in enumerate(times))),
+            channel(*("\n" + block(i % 3, FRONT, times=time) for i, time in enumerate(times))),
             channel(block(1, FRONT)).replace("AC_00031001", "AC_00031002"))), [
                 "4:1: DuplicateID: 'AO_1001' is defined more than once", "4:1: UnreadableTime: start 'soon' is no time",
-                "5:98: UnreadableTime: rtime '00:00:01' is no time", "5:329: UnreadableTime: rtime '1.5' is no time",
-                "5:697: DuplicateID: 'AB_00031001_00000000' is defined more than once"])
+                "6:1: UnreadableTime: rtime '00:00:01' is no time", "7:1: UnreadableTime: rtime '1.5' is no time",
+                "9:1: DuplicateID: 'AB_00031001_00000000' is defined more than once"])
         # Also behind what ends the reading of the elements.
         self.assertEqual([line.split(": ")[1] for line in self.problems(document(
             '<audioObject audioObjectID="AO_1"/>', audio_object("AO_1001"), audio_object("AO_1001")))],

@@ -68,11 +68,11 @@ class LongInfo(CommandTest):
                 self.write(left, wave())
                 self.write(right, wave())
                 for name, partner in ((left, right), (right, left)):
-                    told = self.json("info", name)
+                    told, = self.json("info", name)
                     self.assertEqual((told["stereoPartner"], told["stereoPartnerExists"]), (partner, True))
         self.write("e.L.Wav", wave())
         self.write("E.R.wav", wave())  # the rest of the name must be the same
-        self.assertFalse(self.json("info", "e.L.Wav")["stereoPartnerExists"])
+        self.assertFalse(self.json("info", "e.L.Wav")[0]["stereoPartnerExists"])
 
 
 if __name__ == "__main__":

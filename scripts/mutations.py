@@ -112,7 +112,7 @@ def mutations(source):
     for start, whole in statements(code):
         expression = EXPRESSION.match(code, start)
         end = statement_end(code, start) if expression else None
-        if end:
+        if end and ".reserve(" not in code[start:end]:  # memory that is taken later is the same memory
             add("statement", start, end, ";" + "\n" * code.count("\n", start, end))
         if not whole and (end or CONTROL.match(code, start)):
             add("return", start, start, early_return(code, start) + " ")

@@ -147,6 +147,8 @@ TEST_F(LoopTransients, InCAFReplaceTheItemOfTheirUUID)
     ASSERT_EQ(file.Open(ref, 0), kStatusOK);
     EXPECT_EQ(file.FindChunk(fourCC("uuid")), CAFTransientUUIDChunkData(positions + 1, 1));
     EXPECT_EQ(WriteCAFTransientChunk(ref, positions, INT64_MAX), kStatusParameterError);
+    EXPECT_EQ(WriteCAFTransientChunk(ref, nullptr, 1), kStatusParameterError);
+    EXPECT_EQ(WriteCAFTransientChunk(ref, nullptr, 0), kStatusOK); // none
     EXPECT_EQ(WriteCAFTransientChunk(CFileRef((folder / "none").c_str(), false), positions, 1), kStatusFileNotFound);
     const ContainerBuilder aiff = ContainerBuilder("FORM", "AIFF").format(4).chunk("SSND", 16);
     EXPECT_EQ(WriteCAFTransientChunk(fileOf(aiff), positions, 1), kStatusParameterError);

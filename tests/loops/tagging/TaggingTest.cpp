@@ -5,6 +5,9 @@
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
+#include <bit>
+
 namespace {
 
 TEST(ChunkIDs, EveryUUIDMapsBackAndTheRestMapsToNothing)
@@ -32,6 +35,35 @@ TEST(ChunkIDs, EveryUUIDMapsBackAndTheRestMapsToNothing)
         EXPECT_EQ(chunkIDToCafChunkUUID(id), nullptr);
 }
 
+// Records are swapped by the count in host order, and none behind them.
+TEST(TransientsChunk, IsSwappedAsFarAsItCounts)
+{
+    Bytes original(sizeof(tagging::TransientsChunk) + 3 * sizeof(tagging::TransientRecord));
+    for (std::size_t i = 0; i < original.size(); ++i)
+        original[i] = static_cast<std::byte>(i + 1);
+    store(original.data() + 72, std::int32_t{2}, std::endian::native);
+    Bytes bytes = original;
+    auto* chunk = reinterpret_cast<tagging::TransientsChunk*>(bytes.data());
+    tagging::SwapBasicTransientsChunkToBig(chunk);
+    if (std::endian::native == std::endian::little) {
+        Bytes expected = original;
+        const auto reverse = [&](std::size_t at, std::size_t size, std::size_t times = 1) {
+            for (; times > 0; --times, at += size)
+                std::reverse(expected.begin() + static_cast<std::ptrdiff_t>(at),
+                             expected.begin() + static_cast<std::ptrdiff_t>(at + size));
+        };
+        reverse(0, 2, 4);
+        reverse(8, 4, 17);
+        for (const std::size_t record : {76u, 76u + 24}) {
+            reverse(record, 2, 2);
+            reverse(record + 4, 4, 5);
+        }
+        EXPECT_EQ(toHex(bytes), toHex(expected));
+    }
+    SwapBasicTransientsChunkToHost(chunk);
+    EXPECT_EQ(toHex(bytes), toHex(original));
+}
+
 TEST(CAFPayloads, GoldenBytes)
 {
     const std::int64_t positions[] = {0x123456789A, 3};
@@ -54,6 +86,31 @@ TEST(CAFPayloads, GoldenBytes)
     };
     for (const auto& [payload, bytes] : rows)
         EXPECT_EQ(toHex(payload.value()), hex(bytes));
+}
+
+TEST(CAFPayloads, StringsAreAsManyAsAreCountedAndThere)
+{
+    const struct {
+        const char* payload;
+        std::string strings;
+    } rows[] = {
+        {"00000002 6100 6200 6300 6400", "a=b c=d "},
+        {"00000001 6100 6200 6300 6400", "a=b "}, // what is not counted is not there
+        {"00000000 6100 6200", ""},
+        {"00000002 6100 6200", "a=b "},
+        {"00000003 6100 6200 6300", "a=b "}, // a key without a value
+        {"00000001 6100 62", "a=b "},        // a value without its end
+        {"00000001 6100 00", "a= "},
+        {"00000009", ""},
+        {"0000", ""},
+    };
+    for (const auto& [payload, expected] : rows) {
+        std::string strings;
+        tagging::ForEachCAFInfoString(fromHex(payload), [&](std::string_view key, std::string_view value) {
+            strings += std::string(key) + "=" + std::string(value) + " ";
+        });
+        EXPECT_EQ(strings, expected) << payload;
+    }
 }
 
 } // namespace

@@ -1,6 +1,8 @@
 #include "platform/ffmpeg/Codec.h"
 
+#include "platform/core/Status.h"
 #include "platform/ffmpeg/FFmpegCodec.h"
+#include "platform/ffmpeg/IMACodec.h"
 #include "platform/ffmpeg/WavPackCodec.h"
 
 extern "C" {
@@ -12,6 +14,11 @@ namespace platform::ffmpeg {
 std::unique_ptr<Codec> Codec::open(const AVCodecParameters& parameters, int numerator, int denominator, Padding padding,
                                    std::int32_t& status)
 {
+    if (parameters.codec_id == AV_CODEC_ID_ADPCM_IMA_WAV)
+        if (std::unique_ptr<Codec> codec = IMACodec::open(parameters)) {
+            status = kStatusOK;
+            return codec;
+        }
     // FFmpeg 5.1 gives up on blocks of ordinary files.
     const auto openCodec = parameters.codec_id == AV_CODEC_ID_WAVPACK ? WavPackCodec::open : FFmpegCodec::open;
     return openCodec(parameters, numerator, denominator, padding, status);

@@ -16,7 +16,8 @@ namespace platform::ffmpeg {
 namespace {
 
 /// The one that is right, where there are several. Layers I to III: floats, as integers are dithered, differently after
-/// every seek. Opus: what its makers call right, where FFmpeg's own is off by up to -33 dB.
+/// every seek. Others: the libraries of the codings' makers. FFmpeg's own decoder of Opus is off by up to -33 dB, that
+/// of GSM wraps where it should clip, that of Speex leaves the enhancement out.
 const char* preferredDecoder(AVCodecID coding)
 {
     switch (coding) {
@@ -28,6 +29,12 @@ const char* preferredDecoder(AVCodecID coding)
         return "mp3float";
     case AV_CODEC_ID_OPUS:
         return "libopus";
+    case AV_CODEC_ID_GSM:
+        return "libgsm";
+    case AV_CODEC_ID_GSM_MS:
+        return "libgsm_ms";
+    case AV_CODEC_ID_SPEEX:
+        return "libspeex";
     default:
         return "";
     }

@@ -57,6 +57,8 @@ std::uint64_t framesPerBlockOf(const AVCodecParameters& parameters)
 /// Every packet decodes by itself.
 bool isIndependent(const AVCodecParameters& parameters)
 {
+    if (parameters.codec_id == AV_CODEC_ID_GSM_MS) // blocks of one size, each of which needs those ahead
+        return false;
     constexpr int both = AV_CODEC_PROP_INTRA_ONLY | AV_CODEC_PROP_LOSSLESS;
     const AVCodecDescriptor* descriptor = avcodec_descriptor_get(parameters.codec_id);
     return framesPerBlockOf(parameters) > 0 || (descriptor != nullptr && (descriptor->props & both) == both);

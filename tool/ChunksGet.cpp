@@ -8,6 +8,7 @@
 #include "OutputFile.h"
 #include "Progress.h"
 #include "SidecarChunks.h"
+#include "UnseenCharacters.h"
 
 #include <nlohmann/json.hpp>
 
@@ -28,10 +29,10 @@ struct GetArguments {
 // A body that would do mischief on a terminal; text, as in "iXML" and "axml", is welcome there.
 bool isBinary(std::string_view bytes)
 {
-    return std::any_of(bytes.begin(), bytes.end(), [](char c) {
-        const auto byte = static_cast<unsigned char>(c);
-        return (byte < 0x20 && c != '\n' && c != '\r' && c != '\t') || byte == 0x7F;
-    });
+    return isMisleading(bytes) || std::any_of(bytes.begin(), bytes.end(), [](char c) {
+               const auto byte = static_cast<unsigned char>(c);
+               return (byte < 0x20 && c != '\n' && c != '\r' && c != '\t') || byte == 0x7F;
+           });
 }
 
 /// Hands a body to the sink, piece by piece.

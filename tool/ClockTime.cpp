@@ -47,3 +47,21 @@ std::optional<double> timeFromText(const std::string& text)
         rest.remove_prefix(colon + 1);
     }
 }
+
+std::uint64_t SoundLength::at(double sampleRate) const
+{
+    return seconds ? static_cast<std::uint64_t>(std::min(std::round(*seconds * sampleRate), 9e18)) : frames;
+}
+
+std::optional<SoundLength> soundLengthFromText(const std::string& text)
+{
+    const bool hasUnit = text.ends_with('s');
+    SoundLength length;
+    if (hasUnit || text.find(':') != std::string::npos) {
+        length.seconds = timeFromText(text.substr(0, text.size() - (hasUnit ? 1 : 0)));
+        return length.seconds ? std::optional(length) : std::nullopt;
+    }
+    const char* const end = text.data() + text.size();
+    const auto [rest, error] = std::from_chars(text.data(), end, length.frames);
+    return error == std::errc() && rest == end ? std::optional(length) : std::nullopt;
+}

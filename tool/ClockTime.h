@@ -1,6 +1,7 @@
 // Points in time as people write them: "1:02:03.456".
 #pragma once
 
+#include <cstdint>
 #include <optional>
 #include <string>
 
@@ -14,3 +15,15 @@ std::string durationText(double seconds);
 
 /// Seconds from "12.5", "1:02.5" or "1:02:03.5"; none for what is no time.
 std::optional<double> timeFromText(const std::string& text);
+
+/// A place in a sound or a length of it, in frames or in seconds.
+struct SoundLength {
+    std::uint64_t frames = 0;
+    std::optional<double> seconds;
+
+    /// In frames; 9e18 stands for more.
+    std::uint64_t at(double sampleRate) const;
+};
+/// A number of frames such as "48000", or a time, which shows that it is one: "1.5s", "1:02.5", "1:02:03.5". None for
+/// another text.
+std::optional<SoundLength> soundLengthFromText(const std::string& text);

@@ -2,6 +2,7 @@
 
 #include "ChunkId.h"
 #include "Failure.h"
+#include "UnseenCharacters.h"
 
 #include <algorithm>
 #include <array>
@@ -120,7 +121,7 @@ std::multimap<int, void (*)(CommandLine&)>& registeredVerbs()
 // The parser's own words with its own names of things put into ours.
 std::string usageMessage(const CLI::ParseError& error)
 {
-    std::string message = printable(error.what());
+    std::string message = printableOnError(error.what());
     for (const char* const prefix : {"FILE: ", "ID: ", "FROM: ", "TO: ", "FOLDER: ", "PACKAGE: "})
         if (message.starts_with(prefix))
             message.erase(0, std::string_view(prefix).size());

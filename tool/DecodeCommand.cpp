@@ -3,6 +3,7 @@
 #include "DecodeReport.h"
 #include "DecodeTargets.h"
 #include "FileByFile.h"
+#include "SoundRange.h"
 
 #include <array>
 #include <unistd.h>
@@ -49,6 +50,7 @@ bool runDecode(DecodeArguments& arguments, OutputOptions output)
 {
     arguments.options.wishes.format = &formatFor(arguments);
     arguments.options.quiet = output.quiet;
+    requireOrder(arguments.options.wishes.start, arguments.options.wishes.end);
     const std::vector<DecodeJob> jobs = decodeJobs(arguments.files, arguments.out, *arguments.options.wishes.format);
     const bool toOutput = arguments.out == "-";
     if (toOutput && output.json)
@@ -90,14 +92,6 @@ void addText(CLI::App& verb, const std::string& name, const std::string& label, 
             ""));
 }
 
-void addLength(CLI::App& verb, const std::string& name, std::function<void(const DecodeLength&)> take,
-               const std::string& description)
-{
-    addText(
-        verb, name, "N", decodeLengthFromText, [take](const auto& length) { take(*length); },
-        "neither a number of frames nor a time such as 2.5s or 1:02.5", description);
-}
-
 void addSoundOptions(CLI::App& verb, DecodeWishes& wishes)
 {
     addText(
@@ -110,12 +104,9 @@ void addSoundOptions(CLI::App& verb, DecodeWishes& wishes)
         verb, "--bits", "BITS", depthNamed, [&wishes](const NamedDepth* depth) { wishes.depth = depth->depth; },
         "none of 16, 24, 32, f32",
         "16, 24, 32 or f32 (floats; in AIFF as AIFC); else as in FILE, floats of lossy formats");
-    addLength(
-        verb, "--start", [&wishes](const DecodeLength& length) { wishes.start = length; },
-        "Leave out what is ahead of frame N, or of a time such as 2.5s or 1:02.5");
-    addLength(
-        verb, "--frames", [&wishes](const DecodeLength& length) { wishes.frames = length; },
-        "Stop after N frames, or that time");
+    addSoundRange(verb, {.start = [&wishes](const SoundLength& start) { wishes.start = start; },
+                         .end = [&wishes](const SoundLength& end) { wishes.end = end; },
+                         .frames = [&wishes](const SoundLength& frames) { wishes.frames = frames; }});
 }
 
 void declareDecode(CommandLine& commandLine)

@@ -5,6 +5,7 @@
 #include "Output.h"
 #include "OutputFile.h"
 #include "Progress.h"
+#include "UnseenCharacters.h"
 
 #include <fmt/format.h>
 
@@ -59,18 +60,21 @@ private:
     std::unique_ptr<OutputFile> file_;
 };
 
-/// The frames that came.
-std::int64_t copySamples(DecodeSource& source, Target& target, bool quiet)
+/// The header, and then the samples; returns the frames that came. The first samples go out with the header: who reads
+/// from a pipe looks at what the first read gives.
+std::int64_t copySound(std::string header, DecodeSource& source, Target& target, bool quiet)
 {
     Progress progress("decoding", source.sound().frames, quiet);
     const std::int64_t bytesPerFrame = source.sound().bytesPerFrame();
     std::int64_t done = 0;
     for (std::string_view samples = source.read(); !samples.empty() && !target.failed(); samples = source.read()) {
-        target.write(samples);
+        target.write(header.empty() ? samples : std::string_view(header.append(samples)));
+        header.clear();
         const std::int64_t frames = std::ssize(samples) / bytesPerFrame;
         done += frames;
         progress.advance(frames);
     }
+    target.write(header); // of no samples
     return done;
 }
 
@@ -87,8 +91,7 @@ void setFrames(const DecodeFrame& frame, std::int64_t frames, const DecodeResult
 
 void writeSound(DecodeSource& source, const DecodeFrame& frame, Target& target, bool quiet, DecodeResult& result)
 {
-    target.write(frame.header(source.sound().frames));
-    const std::int64_t frames = copySamples(source, target, quiet);
+    const std::int64_t frames = copySound(frame.header(source.sound().frames), source, target, quiet);
     if (frames != result.sound.frames && !target.failed())
         setFrames(frame, frames, result, target);
     target.write(frame.trailer(frames));
@@ -106,7 +109,7 @@ std::string damageTo(const DecodeSource& source)
 
 void tell(const std::string& path, const std::string& note)
 {
-    fmt::print(stderr, "ktfiles: {}: {}\n", printable(path), printable(note));
+    fmt::print(stderr, "ktfiles: {}: {}\n", printableOnError(path), printableOnError(note));
 }
 
 void tellAll(const std::string& path, const DecodeSource& source, const DecodeResult& result)

@@ -33,24 +33,6 @@ std::int64_t countBeyondFullScale(const float* samples, std::size_t count)
 
 } // namespace
 
-std::uint64_t DecodeLength::at(double sampleRate) const
-{
-    return seconds ? static_cast<std::uint64_t>(std::min(std::round(*seconds * sampleRate), kMostFrames)) : frames;
-}
-
-std::optional<DecodeLength> decodeLengthFromText(const std::string& text)
-{
-    const bool hasUnit = text.ends_with('s');
-    DecodeLength length;
-    if (hasUnit || text.find(':') != std::string::npos) {
-        length.seconds = timeFromText(text.substr(0, text.size() - (hasUnit ? 1 : 0)));
-        return length.seconds ? std::optional(length) : std::nullopt;
-    }
-    const char* const end = text.data() + text.size();
-    const auto [rest, error] = std::from_chars(text.data(), end, length.frames);
-    return error == std::errc() && rest == end ? std::optional(length) : std::nullopt;
-}
-
 DecodeSource::DecodeSource(const std::string& path, const DecodeWishes& wishes)
 {
     open(path);
@@ -123,7 +105,10 @@ void DecodeSource::setRange(const DecodeWishes& wishes)
     const std::uint64_t start = wishes.start.at(sound_.sampleRate);
     if (start > 0 && start >= all)
         throw Failure(fmt::format("has {} frames, and none at {}", all, start));
-    const std::uint64_t wanted = wishes.frames ? wishes.frames->at(sound_.sampleRate) : all - start;
+    const std::uint64_t end = wishes.end ? wishes.end->at(sound_.sampleRate) : all;
+    if (end < start)
+        throw Failure("--end is ahead of --start");
+    const std::uint64_t wanted = wishes.frames ? wishes.frames->at(sound_.sampleRate) : end - start;
     if (wanted > all - start)
         notes_.push_back(fmt::format("only {} of {} frames are there", all - start, wanted));
     left_ = sound_.frames = static_cast<std::int64_t>(std::min(wanted, all - start));

@@ -1,6 +1,7 @@
 // An audio file of any format as the sound that `ktfiles decode` was asked for.
 #pragma once
 
+#include "ClockTime.h"
 #include "DecodeFormat.h"
 #include "platform/ConvertingReader.h"
 
@@ -12,24 +13,15 @@
 #include <string_view>
 #include <vector>
 
-/// A place in the output or a length of it, in frames or in seconds.
-struct DecodeLength {
-    std::uint64_t frames = 0;
-    std::optional<double> seconds;
-
-    std::uint64_t at(double sampleRate) const;
-};
-/// From "48000", "1.5s", "1:02.5" or "1:02:03.5"; none for another text.
-std::optional<DecodeLength> decodeLengthFromText(const std::string& text);
-
 /// What is asked for; what is not stays as the file has it.
 struct DecodeWishes {
     const DecodeFormat* format = nullptr;
     std::optional<double> sampleRate;
     std::optional<std::uint32_t> channels;
     std::optional<SampleDepth> depth;
-    DecodeLength start;
-    std::optional<DecodeLength> frames;
+    // Of the output; of `end` and `frames` one at most.
+    SoundLength start;
+    std::optional<SoundLength> end, frames;
 };
 
 /// Owns the reader. Operations throw Failure.

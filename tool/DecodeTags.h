@@ -1,4 +1,4 @@
-// The loop tags of a file that is decoded.
+// The loop tags of a file that is decoded, and what else it holds beside the sound.
 #pragma once
 
 #include "DecodeFormat.h"
@@ -29,5 +29,6 @@ private:
     void scaleTransients(double factor);
 
     std::shared_ptr<LoopSource> source_; // null: no tags
+    std::vector<std::string> others_;    // chunks that are neither tags nor sound, nor made from the sound
     std::string problem_;                // why they could not be read
 };

@@ -1,6 +1,6 @@
 #include "Failure.h"
 
-#include "Terminal.h"
+#include "UnseenCharacters.h"
 #include "platform/core/Status.h"
 
 #include <fmt/core.h>
@@ -23,5 +23,5 @@ void requireOK(std::int32_t status)
 
 void reportFailure(const std::string& path, const std::string& text)
 {
-    fmt::print(stderr, "ktfiles: {}: {}\n", printable(path), printable(text));
+    fmt::print(stderr, "ktfiles: {}: {}\n", printableOnError(path), printableOnError(text));
 }

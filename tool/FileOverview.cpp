@@ -4,6 +4,7 @@
 #include "InputFile.h"
 #include "Progress.h"
 #include "Terminal.h"
+#include "UnseenCharacters.h"
 #include "loops/overview/MDOverview.h"
 #include "loops/overview/StoredOverview.h"
 
@@ -39,7 +40,7 @@ FileOverview FileOverview::computed(const std::string& path, bool quiet)
     if (overview.info_.missingDataSize > 0 && !quiet)
         fmt::print(stderr,
                    "ktfiles: {}: ends ahead of its sound, {} bytes of which are missing; what is there is shown\n",
-                   printable(path), overview.info_.missingDataSize);
+                   printableOnError(path), overview.info_.missingDataSize);
     Progress progress("reading", overview.info_.frames, quiet);
     long long done = 0;
     std::int32_t status = kStatusOK;

@@ -2,16 +2,18 @@
 // waiting results pile up: whoever is ahead waits.
 #pragma once
 
+#include "StartedThread.h"
+
 #include <condition_variable>
 #include <deque>
 #include <functional>
 #include <mutex>
 #include <optional>
-#include <thread>
 #include <vector>
 
-/// One thread gives jobs, one takes results. `work` runs on all threads at once and must not throw. The destructor
-/// stops the threads after the job that each is at.
+/// One thread gives jobs, one takes results. `work` runs on all threads at once and must not throw. Of the threads as
+/// many work as can be started; without any, the one that takes results works. The destructor stops the threads after
+/// the job that each is at.
 template <class Job, class Result>
 class OrderedWork {
 public:
@@ -19,8 +21,12 @@ public:
         : window_(window),
           work_(std::move(work))
     {
+        threads_.reserve(threads);
         for (unsigned i = 0; i < threads; ++i)
-            threads_.emplace_back([this] { workUntilDone(); });
+            if (std::jthread thread = startedThread([this] { workUntilDone(); }); thread.joinable())
+                threads_.push_back(std::move(thread));
+            else
+                break;
     }
     ~OrderedWork() { stop(); }
 
@@ -32,7 +38,7 @@ public:
         if (stopped_)
             return false;
         entries_.push_back({std::move(job), {}});
-        ready_.notify_one();
+        (threads_.empty() ? done_ : ready_).notify_one();
         return true;
     }
     /// No job will follow.
@@ -47,9 +53,19 @@ public:
     std::optional<Result> take()
     {
         std::unique_lock lock(mutex_);
-        done_.wait(lock, [this] { return entries_.empty() ? closed_ : entries_.front().result.has_value(); });
+        done_.wait(lock, [this] {
+            return entries_.empty() ? closed_ : threads_.empty() || entries_.front().result.has_value();
+        });
         if (entries_.empty())
             return std::nullopt;
+        if (threads_.empty()) {
+            ++started_;
+            Entry& entry = entries_.front(); // stays where it is while others come behind it
+            lock.unlock();
+            Result result = work_(entry.job);
+            lock.lock();
+            entry.result = std::move(result);
+        }
         std::optional<Result> result = std::move(entries_.front().result);
         entries_.pop_front();
         --started_;

@@ -1,6 +1,7 @@
 #include "Output.h"
 
 #include "Failure.h"
+#include "UnseenCharacters.h"
 
 #include <nlohmann/json.hpp>
 
@@ -65,5 +66,5 @@ bool Output::finish()
 
 std::string jsonText(const nlohmann::ordered_json& value)
 {
-    return value.dump(-1, ' ', false, nlohmann::ordered_json::error_handler_t::replace);
+    return withEscapes(value.dump(-1, ' ', false, nlohmann::ordered_json::error_handler_t::replace));
 }

@@ -8,6 +8,7 @@
 #include "OverviewStore.h"
 #include "PNGPicture.h"
 #include "SVGPicture.h"
+#include "SoundRange.h"
 
 #include <filesystem>
 #include <unistd.h>
@@ -21,6 +22,8 @@ struct OverviewArguments {
     std::vector<std::string> files;
     std::string png, svg;
     PictureSettings picture;
+    SoundLength start;
+    std::optional<SoundLength> end, frames;
     PictureColors colors = defaultColors();
     bool fromStored = false;
     bool store = false;
@@ -42,9 +45,19 @@ void writePicture(const std::string& out, const std::string& path, const std::st
 
 void drawPictures(const std::string& path, const Waveform& waveform, const OverviewArguments& arguments)
 {
-    if (arguments.picture.start >= waveform.seconds())
+    PictureSettings settings = arguments.picture;
+    const double rate = waveform.sampleRate;
+    const std::uint64_t start = arguments.start.at(rate);
+    settings.start = static_cast<double>(start) / rate;
+    if (settings.start >= waveform.seconds())
         throw Failure(fmt::format("ends at {}, ahead of the start of the picture", durationText(waveform.seconds())));
-    const WaveformPicture picture = pictureOf(waveform, arguments.picture);
+    if (arguments.end)
+        settings.end = static_cast<double>(arguments.end->at(rate)) / rate;
+    if (arguments.frames)
+        settings.end = static_cast<double>(start) / rate + static_cast<double>(arguments.frames->at(rate)) / rate;
+    if (settings.end <= settings.start)
+        throw Failure("there is nothing between the start and the end of the picture");
+    const WaveformPicture picture = pictureOf(waveform, settings);
     if (!arguments.png.empty())
         writePicture(arguments.png, path, pngOf(picture, arguments.colors));
     if (!arguments.svg.empty())
@@ -84,7 +97,7 @@ void requireSense(const OverviewArguments& arguments, const CLI::App& verb, cons
     if (arguments.draws() && arguments.files.size() > 1)
         throw CLI::ValidationError("--png and --svg draw one file at a time");
     if (!arguments.draws())
-        for (const char* const option : {"--width", "--height", "--start", "--end", "--colors", "--scale"})
+        for (const char* const option : {"--width", "--height", "--start", "--end", "--frames", "--colors", "--scale"})
             if (given(option))
                 throw CLI::ValidationError(std::string(option) + " is about a picture: --png or --svg says where to");
     if (!arguments.store)
@@ -93,8 +106,7 @@ void requireSense(const OverviewArguments& arguments, const CLI::App& verb, cons
                 throw CLI::ValidationError(std::string(option) + " is about --store");
     if (arguments.store && arguments.fromStored)
         throw CLI::ValidationError("--store computes the overview, --stored does not");
-    if (arguments.picture.start >= arguments.picture.end)
-        throw CLI::ValidationError("--start is not ahead of --end");
+    requireOrder(arguments.start, arguments.end);
     if (arguments.draws() && arguments.png == arguments.svg)
         throw CLI::ValidationError("--png and --svg name the same file");
     const bool toOutput = arguments.png == "-" || arguments.svg == "-";
@@ -127,18 +139,6 @@ bool runOverview(OverviewArguments& arguments, const CLI::App& verb, OutputOptio
     return good;
 }
 
-void addTime(CLI::App& verb, const std::string& name, double& seconds, const std::string& description)
-{
-    verb.add_option_function<std::string>(
-            name, [&seconds](const std::string& text) { seconds = timeFromText(text).value_or(0); }, description)
-        ->option_text("TIME")
-        ->check(CLI::Validator(
-            [](std::string& text) {
-                return timeFromText(text) ? "" : "\"" + printable(text) + "\" is no time, such as 2.5 or 1:02:03.5";
-            },
-            ""));
-}
-
 void addSize(CLI::App& verb, const std::string& name, int& pixels, std::pair<int, int> range)
 {
     verb.add_option(name, pixels,
@@ -153,8 +153,9 @@ void addPictureOptions(CLI::App& verb, OverviewArguments& arguments)
     CommandLine::addPath(verb, "--svg", arguments.svg, "Draw an SVG; \"-\" is standard output")->option_text("OUT");
     addSize(verb, "--width", arguments.picture.width, kWidths);
     addSize(verb, "--height", arguments.picture.height, kHeights);
-    addTime(verb, "--start", arguments.picture.start, "Where the picture begins, in seconds or as M:SS");
-    addTime(verb, "--end", arguments.picture.end, "Where it ends");
+    addSoundRange(verb, {.start = [&arguments](const SoundLength& start) { arguments.start = start; },
+                         .end = [&arguments](const SoundLength& end) { arguments.end = end; },
+                         .frames = [&arguments](const SoundLength& frames) { arguments.frames = frames; }});
     verb.add_flag("--scale", arguments.picture.scale, "Show a scale of the amplitude, in decibels");
     verb.add_option_function<std::string>(
             "--colors",

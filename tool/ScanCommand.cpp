@@ -32,16 +32,16 @@ struct BadFile {
     std::string problem;
 };
 
-void walkInto(ScanWork& work, const std::vector<std::string>& folders)
+// Until `give` says that no more is wanted.
+void walkBatches(const std::vector<std::string>& folders, const std::function<bool(Batch)>& give)
 {
     Batch batch;
     FolderWalk walk(folders, [&](const std::string& path, const std::string& problem) {
         batch.push_back({path, problem});
-        return batch.size() < kBatch || work.give(std::exchange(batch, {}));
+        return batch.size() < kBatch || give(std::exchange(batch, {}));
     });
     if (walk.run() && !batch.empty())
-        work.give(std::move(batch));
-    work.close();
+        give(std::move(batch));
 }
 
 // Counts ahead of the scan, which costs it little: no file is opened.
@@ -62,30 +62,62 @@ unsigned threadsFor(const ScanArguments& arguments)
     return std::clamp(threads, 1U, kMostThreads);
 }
 
-// Takes the results in order; the bad files are returned, to be listed at the end.
-std::vector<BadFile> writeRecords(ScanWork& work, ScanWriter& writer, ScanProgress& progress)
-{
-    Output& output = Output::standard();
-    const bool sharesTerminal = progress.isActive() && isTerminal(STDOUT_FILENO);
-    std::vector<BadFile> bad;
-    while (auto records = work.take()) {
-        const bool prints = std::any_of(records->begin(), records->end(),
+// Puts results out in their order, and keeps the bad files, to be listed at the end.
+class ResultWriter {
+public:
+    ResultWriter(ScanWriter& writer, ScanProgress& progress) : writer_(writer), progress_(progress) {}
+
+    /// False when no more is wanted.
+    bool add(Records records)
+    {
+        Output& output = Output::standard();
+        const bool sharesTerminal = progress_.isActive() && isTerminal(STDOUT_FILENO);
+        const bool prints = std::any_of(records.begin(), records.end(),
                                         [](const ScanRecord& record) { return record.kind == ScanRecord::loop; });
         if (sharesTerminal && prints)
-            progress.hide();
-        for (ScanRecord& record : *records)
+            progress_.hide();
+        for (ScanRecord& record : records)
             if (record.kind == ScanRecord::loop)
-                writer.add(record);
+                writer_.add(record);
             else if (record.kind == ScanRecord::bad)
-                bad.push_back({std::move(record.path), std::move(record.text)});
+                bad_.push_back({std::move(record.path), std::move(record.text)});
         if (sharesTerminal && prints)
             output.flush();
         if (output.failed())
-            break;
-        progress.advance(std::ssize(*records));
+            return false;
+        progress_.advance(std::ssize(records));
+        return true;
     }
+    const std::vector<BadFile>& bad() const { return bad_; }
+
+private:
+    ScanWriter& writer_;
+    ScanProgress& progress_;
+    std::vector<BadFile> bad_;
+};
+
+// The work of the threads, done without any.
+void scanHere(const std::vector<std::string>& folders, const std::function<Records(const Batch&)>& scan,
+              ResultWriter& results)
+{
+    walkBatches(folders, [&](const Batch& batch) { return results.add(scan(batch)); });
+}
+
+void scanByThreads(const ScanArguments& arguments, const std::function<Records(const Batch&)>& scan,
+                   ResultWriter& results)
+{
+    const unsigned threads = threadsFor(arguments);
+    ScanWork work(threads, std::size_t{threads} * kBatchesPerThread, scan);
+    const std::jthread walker = startedThread([&] {
+        walkBatches(arguments.folders, [&](Batch batch) { return work.give(std::move(batch)); });
+        work.close();
+    });
+    if (!walker.joinable()) // it and who takes its results must not be one thread
+        return scanHere(arguments.folders, scan, results);
+    while (auto records = work.take())
+        if (!results.add(std::move(*records)))
+            break;
     work.stop();
-    return bad;
 }
 
 bool runScan(const ScanArguments& arguments, const OutputOptions& options)
@@ -94,27 +126,28 @@ bool runScan(const ScanArguments& arguments, const OutputOptions& options)
         throw CLI::ValidationError("--csv and --json exclude each other");
     const ScanForm form = arguments.csv ? ScanForm::csv : scanForm(outputForm(options));
     ScanWriter writer(form, usesColor(options.color));
-    std::vector<BadFile> bad;
+    ScanProgress progress(options.quiet);
+    ResultWriter results(writer, progress);
     {
-        const unsigned threads = threadsFor(arguments);
-        ScanProgress progress(options.quiet);
-        ScanWork work(threads, std::size_t{threads} * kBatchesPerThread, [form](const Batch& batch) {
-            Records records;
-            for (const ScanItem& item : batch)
-                records.push_back(scanFile(item, form));
-            return records;
-        });
         std::jthread counter;
         if (progress.isActive())
-            counter = std::jthread([&](const std::stop_token& stop) { countInto(progress, arguments.folders, stop); });
-        const std::jthread walker([&] { walkInto(work, arguments.folders); });
-        bad = writeRecords(work, writer, progress);
+            counter = startedThread([&](const std::stop_token& stop) { countInto(progress, arguments.folders, stop); });
+        scanByThreads(
+            arguments,
+            [form](const Batch& batch) {
+                Records records;
+                for (const ScanItem& item : batch)
+                    records.push_back(scanFile(item, form));
+                return records;
+            },
+            results);
     }
+    progress.hide();
     writer.finish();
     Output::standard().flush(); // ahead of what follows on standard error
-    for (const BadFile& file : bad)
+    for (const BadFile& file : results.bad())
         reportFailure(file.path, file.problem);
-    return bad.empty();
+    return results.bad().empty();
 }
 
 void declareScan(CommandLine& commandLine)

@@ -29,8 +29,12 @@ bool isCalledLoop(const std::string& path)
     return extension == ".aif" || extension == ".aiff" || extension == ".caf";
 }
 
-void appendField(std::string& line, std::string_view text)
+// As it is, which programs want; a terminal must not take part of a name for a command.
+void appendField(std::string& line, std::string_view bytes)
 {
+    static const bool onTerminal = isTerminal(STDOUT_FILENO);
+    const std::string fit = onTerminal ? printable(bytes) : std::string();
+    const std::string_view text = onTerminal ? fit : bytes;
     if (text.find_first_of(",\"\r\n") == std::string_view::npos) {
         line += text;
         return;

@@ -1,5 +1,7 @@
 #include "Terminal.h"
 
+#include "UnseenCharacters.h"
+
 #include <fmt/core.h>
 
 #include <algorithm>
@@ -32,6 +34,27 @@ wchar_t takeCharacter(std::string_view& text)
     return good ? character : L'\xFFFD';
 }
 
+std::string printableText(std::string_view text, bool onTerminal)
+{
+    if (std::all_of(text.begin(), text.end(), [](char c) { return c >= ' ' && c <= '~'; }))
+        return std::string(text); // most are
+    std::string result;
+    while (!text.empty()) {
+        const std::string_view before = text;
+        const wchar_t character = takeCharacter(text);
+        const std::string_view bytes = before.substr(0, before.size() - text.size());
+        const bool isHidden = onTerminal && isUnseen(static_cast<char32_t>(character));
+        if (character == L'\xFFFD')
+            result += "\xEF\xBF\xBD";
+        else if (!isHidden && ::wcwidth(character) >= 0 && character != 0)
+            result += bytes;
+        else
+            for (const char byte : bytes)
+                fmt::format_to(std::back_inserter(result), "\\x{:02X}", static_cast<unsigned char>(byte));
+    }
+    return result;
+}
+
 } // namespace
 
 bool isTerminal(int descriptor)
@@ -57,22 +80,14 @@ int terminalColumns()
 
 std::string printable(std::string_view text)
 {
-    if (std::all_of(text.begin(), text.end(), [](char c) { return c >= ' ' && c <= '~'; }))
-        return std::string(text); // most are
-    std::string result;
-    while (!text.empty()) {
-        const std::string_view before = text;
-        const wchar_t character = takeCharacter(text);
-        const std::string_view bytes = before.substr(0, before.size() - text.size());
-        if (character == L'\xFFFD')
-            result += "\xEF\xBF\xBD";
-        else if (::wcwidth(character) >= 0 && character != 0)
-            result += bytes;
-        else
-            for (const char byte : bytes)
-                fmt::format_to(std::back_inserter(result), "\\x{:02X}", static_cast<unsigned char>(byte));
-    }
-    return result;
+    static const bool onTerminal = isTerminal(STDOUT_FILENO);
+    return printableText(text, onTerminal);
+}
+
+std::string printableOnError(std::string_view text)
+{
+    static const bool onTerminal = isTerminal(STDERR_FILENO);
+    return printableText(text, onTerminal);
 }
 
 int displayWidth(std::string_view text)

@@ -14,7 +14,7 @@ bool usesColor(ColorMode mode);
 /// Columns of the terminal behind standard error; 80 when it does not say.
 int terminalColumns();
 
-/// `text` fit for one line of a terminal: control characters as `\xNN`, bytes that are not UTF-8 as U+FFFD.
+/// `text` fit for one line: control characters, on a terminal unseen ones too, as `\xNN`; what is not UTF-8 as U+FFFD.
 std::string printable(std::string_view text);
 
 /// Terminal columns that a text from `printable` takes: 2 for wide characters, 0 for combining ones.

@@ -1,7 +1,7 @@
 #include "Waiting.h"
 
 #include "Failure.h"
-#include "Terminal.h"
+#include "UnseenCharacters.h"
 #include "platform/OperationQueue.h"
 
 #include <fmt/format.h>
@@ -51,7 +51,7 @@ void awaitOthers(const std::string& path, const WaitOptions& options, const std:
 
 void printWaiting(const std::string& path, const std::string& blockers)
 {
-    fmt::print(stderr, "ktfiles: {}: waiting for {} ...\n", printable(path), blockers);
+    fmt::print(stderr, "ktfiles: {}: waiting for {} ...\n", printableOnError(path), printableOnError(blockers));
 }
 
 std::string stillInUseText(const std::string& blockers, double seconds)

@@ -25,7 +25,7 @@ _ktfiles()
         decode/--format) COMPREPLY=($(compgen -W 'wav aiff caf raw' -- "$cur")); return ;;
         decode/--bits) COMPREPLY=($(compgen -W '16 24 32 f32' -- "$cur")); return ;;
         decode/--rate) COMPREPLY=($(compgen -W '44100 48000 88200 96000' -- "$cur")); return ;;
-        decode/--channels | decode/--frames) return ;;
+        decode/--channels | */--frames) return ;;
     esac
     case $prev in
         --color) COMPREPLY=($(compgen -W 'auto always never' -- "$cur")); return ;;
@@ -55,10 +55,10 @@ _ktfiles()
             chunks/remove) COMPREPLY=($(compgen -W "--sidecar --force $edit $common" -- "$cur")) ;;
             adm/*) COMPREPLY=($(compgen -W "--long --lenient --check $common" -- "$cur")) ;;
             tags/set | tags/remove | tags/copy) COMPREPLY=($(compgen -W "$edit $common" -- "$cur")) ;;
-            overview/*) COMPREPLY=($(compgen -W "--png --svg --width --height --start --end --scale --colors --stored
-                --store $edit $common" -- "$cur")) ;;
-            decode/*) COMPREPLY=($(compgen -W "--output --format --rate --channels --bits --start --frames --conceal --force
-                $common" -- "$cur")) ;;
+            overview/*) COMPREPLY=($(compgen -W "--png --svg --width --height --start --end --frames --scale --colors
+                --stored --store $edit $common" -- "$cur")) ;;
+            decode/*) COMPREPLY=($(compgen -W "--output --format --rate --channels --bits --start --end --frames --conceal
+                --force $common" -- "$cur")) ;;
             lock/*) COMPREPLY=($(compgen -W "--read --write --presenter --timeout -- $common" -- "$cur")) ;;
             scan/*) COMPREPLY=($(compgen -W "--csv --threads $common" -- "$cur")) ;;
             project/media) COMPREPLY=($(compgen -W "--missing --alternative $common" -- "$cur")) ;;

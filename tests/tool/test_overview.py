@@ -91,13 +91,16 @@ class Picture(CommandTest):
                         self.assert_edges(picture.extent(x), expected(x))
 
     def test_a_range_is_cut_out(self):
-        points, picture = self.draw(click(80000, 40000), "--start", "0:04", "--end", "6", width=60)
+        points, picture = self.draw(click(80000, 40000), "--start", "0:04", "--end", "6s", width=60)
         tops = [picture.extent(x)[0] for x in range(60)]
         self.assertTrue(29 <= tops.index(min(tops)) <= 31)
-        _, beyond = self.draw(click(80000, 40000), "--start", "4", "--end", "100:00", width=60)
+        for same in (("--start", "32000", "--end", "48000"), ("--start", "32000", "--frames", "2s"),
+                     ("--start", "4s", "--frames", "16000")):
+            self.assertEqual(self.draw(click(80000, 40000), *same, width=60)[1].extent(30), picture.extent(30), same)
+        _, beyond = self.draw(click(80000, 40000), "--start", "4s", "--end", "100:00", width=60)
         tops = [beyond.extent(x)[0] for x in range(60)]
         self.assertTrue(9 <= tops.index(min(tops)) <= 11)
-        self.assertIn("ends at 0:10.000", self.failure("overview", "a.wav", "--svg", "-", "--start", "10"))
+        self.assertIn("ends at 0:10.000", self.failure("overview", "a.wav", "--svg", "-", "--start", "10s"))
 
     def test_twelve_hours(self):
         seconds = 12 * 3600
@@ -195,7 +198,8 @@ class Output(CommandTest):
         for arguments in ((), ("a.wav", "a.wav", "--png", "x"), ("a.wav", "--png", "x", "--svg", "x"),
                           ("a.wav", "--png", "-", "--json"), ("a.wav", "--width", "100"), ("a.wav", "--start", "1"),
                           ("a.wav", "--svg", "x", "--width", "15"), ("a.wav", "--svg", "x", "--height", "5000"),
-                          ("a.wav", "--svg", "x", "--start", "2", "--end", "2"), ("a.wav", "--in-place"),
+                          ("a.wav", "--svg", "x", "--start", "2", "--end", "2"),
+                          ("a.wav", "--svg", "x", "--frames", "2", "--end", "2"), ("a.wav", "--frames", "1"), ("a.wav", "--in-place"),
                           *(("a.wav", "--svg", "x", "--start", time) for time in ("-1", "1:60", "1:2:3:4", "x", "")),
                           *(("a.wav", "--svg", "x", "--colors", colors)
                             for colors in ("red", "fff", "fff,1234", "1,2,3,4")),

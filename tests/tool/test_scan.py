@@ -3,6 +3,7 @@ import csv
 import io
 import json
 import os
+import resource
 import shutil
 import struct
 import subprocess
@@ -74,6 +75,33 @@ class Scan(CommandTest):
         expected = sorted(f"lib/{i % 7}/{i:04}.aiff" for i in range(600))
         for threads in ("1", "2", "16"):
             self.assertEqual(self.paths("lib", "--threads", threads), expected)
+        for stack in (1 << 40, 700 << 20, 300 << 20):  # no room for the stack of any thread, or for those of a few
+            def limit(stack=stack):
+                resource.setrlimit(resource.RLIMIT_AS, (2 << 30, 2 << 30))
+                resource.setrlimit(resource.RLIMIT_STACK, (stack, stack))
+            self.assertEqual(self.paths("lib", "--threads", "16", preexec_fn=limit), expected, stack)
+
+    NASTY = "a\x1b[31m\x7f\u009b31m\u202egnp\u200b\u2028\U000e0041é"
+
+    def test_a_terminal_is_sent_no_commands_and_no_hidden_characters(self):
+        name = f"x{self.NASTY}.aiff"
+        self.loop("lib/" + name, genre=self.NASTY)
+        self.write("lib/bad\u202e.caf", b"x")
+        for arguments in (["scan", "lib"], ["scan", "--csv", "lib"], ["scan", "--json", "lib"], ["tags", "lib/" + name],
+                          ["tags", "--json", "lib/" + name], ["info", "lib/" + name], ["chunks", "lib/" + name],
+                          ["tags", "copy", "lib/bad\u202e.caf", "lib/" + name], ["tags", "set", "lib/" + name, "key=\u202e"],
+                          ["chunks", "get", "lib/" + name, "NAME"]):
+            text, _ = self.on_terminal(*arguments, NO_COLOR="1")
+            self.assertFalse([c for c in text if c in self.NASTY[1:-1] and ord(c) > 126 or ord(c) < 32 and c not in "\r\n"],
+                             (arguments, text))
+        rows = list(csv.reader(io.StringIO(self.run_command("scan", "--csv", "lib", status=1).stdout.decode(), newline="")))
+        self.assertEqual((rows[1][0], rows[1][rows[0].index("genre")]), ("lib/" + name, self.NASTY))
+        piped = self.run_command("scan", "--json", "lib", status=1)
+        self.assertEqual([item["genre"] for item in json.loads(piped.stdout)], [self.NASTY])
+        self.assertNotIn("\u202e", piped.stdout.decode())
+        self.assertIn("é", piped.stdout.decode())
+        self.assertIn("bad\u202e.caf", piped.stderr.decode())
+        self.assertIn("\u202egnp", self.run_command("tags", "lib/" + name).stdout.decode())
 
     def test_a_reader_that_goes_away_ends_the_scan(self):
         for i in range(3):

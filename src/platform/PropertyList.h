@@ -20,11 +20,17 @@ inline constexpr int kPropertyListMaximumDepth = 512;
 /// seconds).
 KT_EXPORT std::optional<Bytes> writePropertyList(const Value& value, PropertyListFormat format, Error* error = nullptr);
 
+/// What becomes of single values that a `Value` cannot hold, or that are written wrongly. `strict`: the list is
+/// refused. `lenient`: an integer that needs more than 64 signed bits is read as the nearest real; anything else is
+/// left out of its dictionary, and null in an array. A list that is not whole and sound is refused by both.
+enum class PropertyListReading { strict, lenient };
+
 /// Reads a list of either format, told by its first bytes. Null, with `error`, when it is not whole and sound, or holds
 /// what a `Value` cannot (an integer that needs more than 64 signed bits, a set, an archive's UID). Of two equal keys
 /// the last wins. Memory stays in proportion to the bytes: a binary list may refer to one object from many places, and
 /// is refused once the values unfolded from it need more than 256 times its bytes and 64 KiB; XML entities other
 /// than the five predefined ones, and declarations inside the DOCTYPE, are refused.
-KT_EXPORT std::optional<Value> readPropertyList(BytesView bytes, Error* error = nullptr);
+KT_EXPORT std::optional<Value> readPropertyList(BytesView bytes, Error* error = nullptr,
+                                                PropertyListReading reading = PropertyListReading::strict);
 
 } // namespace platform

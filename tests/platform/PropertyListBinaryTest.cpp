@@ -93,6 +93,26 @@ TEST(PropertyListBinary, MalformedIsRefused)
     }
 }
 
+TEST(PropertyListBinary, LenientReadingLeavesOutWhatCannotBeRead)
+{
+    const std::string zeros(32, '\0');
+    const auto lenient = [](const std::vector<std::string>& objects) {
+        return readPropertyList(bytesOf(binaryList(objects)), nullptr, PropertyListReading::lenient);
+    };
+    // Whole objects of types that there are not, so that nothing else is wrong with them.
+    for (const char marker : {'\x00', '\x07', '\x0A', '\x15', '\x1F', '\x21', '\x24', '\x30', '\x32', '\x34', '\x80'}) {
+        const std::string object = marker + zeros;
+        EXPECT_FALSE(readPropertyList(bytesOf(binaryList({object})))) << int{marker};
+        EXPECT_FALSE(lenient({object})) << int{marker};
+        EXPECT_EQ(lenient({raw("\xA2\1\2"), object, "\x09"}), Value(Array{Value(), true})) << int{marker};
+    }
+    EXPECT_EQ(lenient({raw("\xD3\1\2\3\4\5\6"), "\x51k", "\x09", "\x51l", raw("\x51\xE9"), "\x08",
+                       "\x14" + std::string(8, '\0') + std::string(8, '\xFF')}),
+              Value(Dictionary{{"l", 18446744073709551615.0}}));
+    EXPECT_FALSE(lenient({raw("\xA1\x01")}));
+    EXPECT_FALSE(lenient({raw("\x13\0\0\0")}));
+}
+
 TEST(PropertyListBinary, SharedObjectsDoNotUnfoldWithoutLimit)
 {
     std::vector<std::string> objects;

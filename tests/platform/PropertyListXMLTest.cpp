@@ -28,6 +28,9 @@ TEST(PropertyListXML, WhatOtherWritersMayWrite)
         {xmlList("<data> AAE\nC Aw </data>"), Bytes{std::byte{0}, std::byte{1}, std::byte{2}, std::byte{3}}},
         {xmlList("<dict><key>k</key><string>1</string><key>k</key><string>2</string></dict>"), Dictionary{{"k", "2"}}},
         {xmlList("<date> 2000-12-31T23:59:59Z </date>"), Date{-1}},
+        {xmlList("<date>2001-01-01T00:00:01.250Z</date>"), Date{1.25}},
+        {xmlList("<data>ab+/yz09</data>"),
+         Bytes{std::byte{0x69}, std::byte{0xBF}, std::byte{0xBF}, std::byte{0xCB}, std::byte{0x3D}, std::byte{0x3D}}},
     };
     for (const auto& c : cases) {
         Error error;
@@ -54,6 +57,10 @@ TEST(PropertyListXML, MalformedIsRefusedAndTheLineNamed)
                                          "<real>1,5</real>",
                                          "<date>2026-02-30T00:00:00Z</date>",
                                          "<date>0000-01-01T00:00:00Z</date>",
+                                         "<date>2026-01-01T00:00:00.Z</date>",
+                                         "<date>2026-01-01T00:00:00.5</date>",
+                                         "<date>2026-01-01T00:00:00x5Z</date>",
+                                         "<date>2026-01-01T00:00:00.5xZ</date>",
                                          "<data>A</data>",
                                          "<data>A*==</data>",
                                          "<string>&unknown;</string>",
@@ -72,6 +79,31 @@ TEST(PropertyListXML, MalformedIsRefusedAndTheLineNamed)
     for (int i = 0; i < 100'000; ++i)
         deep += "<array>";
     EXPECT_FALSE(readPropertyList(bytesOf(xmlList(deep))));
+}
+
+TEST(PropertyListXML, LenientReadingLeavesOutWhatCannotBeRead)
+{
+    const auto lenient = [](std::string_view content) {
+        return readPropertyList(bytesOf(xmlList(content)), nullptr, PropertyListReading::lenient);
+    };
+    EXPECT_EQ(lenient("<dict><key>a</key><real/><key>b</key><integer>-9223372036854775809</integer><key>c</key>"
+                      "<date>today</date><key>d</key><data>A</data><key>e</key><integer>7</integer></dict>"),
+              Value(Dictionary{{"b", -9223372036854775808.0}, {"e", 7}}));
+    EXPECT_EQ(lenient("<array><integer>18446744073709551615</integer><integer>x</integer><true/></array>"),
+              Value(Array{18446744073709551615.0, Value(), true}));
+    for (const std::string_view content :
+         {"<real/>", "<array><set/></array>", "<dict><true/></dict>", "<array>x</array>"})
+        EXPECT_FALSE(lenient(content)) << content;
+}
+
+TEST(PropertyListXML, IsWrittenForPeopleToo)
+{
+    const Value value = Dictionary{{"a", Array{1, "x"}}, {"b", Bytes(3)}, {"c", Dictionary{}}};
+    EXPECT_EQ(
+        textOf(*writePropertyList(value, PropertyListFormat::xml)),
+        "<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n<plist version=\"1.0\">\n<dict>\n\t<key>a</key>\n\t<array>\n"
+        "\t\t<integer>1</integer>\n\t\t<string>x</string>\n\t</array>\n\t<key>b</key>\n\t<data>\n\tAAAA\n\t</data>\n"
+        "\t<key>c</key>\n\t<dict/>\n</dict>\n</plist>\n");
 }
 
 // The parser's own refusals are those of XMLParserTest.cpp; that it was given other limits must not lift them.

@@ -37,13 +37,16 @@ std::optional<Bytes> writePropertyList(const Value& value, PropertyListFormat fo
     return std::nullopt;
 }
 
-std::optional<Value> readPropertyList(BytesView bytes, Error* error)
+std::optional<Value> readPropertyList(BytesView bytes, Error* error, PropertyListReading reading)
 {
     Value value;
     std::string problem = "neither XML nor the binary format";
-    if (isBinary(bytes) ? plist::readBinary(bytes, value, problem)
-                        : mayBeXML(bytes) && plist::readXML(bytes, value, problem))
+    const bool isRead = isBinary(bytes) ? plist::readBinary(bytes, value, problem, reading)
+                                        : mayBeXML(bytes) && plist::readXML(bytes, value, problem, reading);
+    if (isRead && !value.isNull())
         return value;
+    if (isRead)
+        problem = "its only value cannot be read";
     fail(error, ErrorDomain::status, kStatusParameterError, "property list: " + problem);
     return std::nullopt;
 }

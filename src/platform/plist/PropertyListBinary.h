@@ -2,6 +2,7 @@
 // Everything in it is big-endian; objects refer to each other by their number in the table.
 #pragma once
 
+#include "platform/PropertyList.h"
 #include "platform/core/Bytes.h"
 #include "platform/core/Packed.h"
 #include "platform/core/Value.h"
@@ -71,7 +72,7 @@ inline bool isASCII(std::string_view text)
 }
 
 /// False, with `problem`, when the bytes are not whole and sound.
-bool readBinary(BytesView bytes, Value& value, std::string& problem);
+bool readBinary(BytesView bytes, Value& value, std::string& problem, PropertyListReading reading);
 /// False, with `problem`, when the value is none that a list can hold.
 bool writeBinary(const Value& value, Bytes& bytes, std::string& problem);
 

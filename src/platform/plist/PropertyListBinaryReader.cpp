@@ -4,6 +4,7 @@
 #include "platform/plist/PropertyListBinary.h"
 
 #include <algorithm>
+#include <cmath>
 #include <cstring>
 #include <limits>
 
@@ -22,8 +23,9 @@ std::uint64_t unsignedNumber(BytesView field)
 
 class Reader {
 public:
-    Reader(BytesView bytes, std::string& problem)
+    Reader(BytesView bytes, std::string& problem, PropertyListReading reading)
         : bytes_(bytes),
+          isLenient_(reading == PropertyListReading::lenient),
           budget_(unfoldingBudget(bytes.size())),
           problem_(problem)
     {
@@ -56,8 +58,15 @@ private:
         problem_ = problem;
         return false;
     }
+    /// The object alone is not to be had: null where that is let pass.
+    bool leaveOut(Value& value, const char* problem)
+    {
+        value = Value();
+        return isLenient_ || fail(problem);
+    }
 
     BytesView bytes_;
+    const bool isLenient_;
     BinaryTrailer trailer_;
     BytesView objects_; // from the start of the file, so that offsets index it
     BytesView offsets_; // exactly objectCount entries
@@ -137,14 +146,14 @@ bool Reader::readScalar(BinaryKind kind, unsigned low, ByteReader& in, Value& va
     else if (kind == BinaryKind::date && low == 3)
         value = Date{in.read<double>()};
     else
-        return fail("an object of unknown type");
+        return leaveOut(value, "an object of unknown type");
     return in.ok() || fail("an object is cut short");
 }
 
 bool Reader::readInteger(unsigned low, ByteReader& in, Value& value)
 {
     if (low > 4)
-        return fail("an object of unknown type");
+        return leaveOut(value, "an object of unknown type");
     std::uint64_t high = 0;
     if (low == 4)
         high = in.read<std::uint64_t>();
@@ -152,9 +161,12 @@ bool Reader::readInteger(unsigned low, ByteReader& in, Value& value)
     if (!in.ok())
         return fail("an object is cut short");
     const auto result = static_cast<std::int64_t>(number);
-    if (low == 4 && high != (result < 0 ? std::numeric_limits<std::uint64_t>::max() : 0))
-        return fail("an integer needs more than 64 bits");
     value = result;
+    if (low == 4 && high != (result < 0 ? std::numeric_limits<std::uint64_t>::max() : 0)) {
+        if (!isLenient_)
+            return fail("an integer needs more than 64 bits");
+        value = std::ldexp(static_cast<double>(static_cast<std::int64_t>(high)), 64) + static_cast<double>(number);
+    }
     return true;
 }
 
@@ -169,12 +181,12 @@ bool Reader::readCounted(BinaryKind kind, std::uint64_t count, ByteReader& in, V
             text[i] = loadBE<char16_t>(units.data() + i * 2);
         const String decoded = String::fromUTF16(text);
         if (decoded.isNull())
-            return fail("a text is not UTF-16");
+            return leaveOut(value, "a text is not UTF-16");
         value = decoded.utf8();
         return charge(decoded.utf8().size());
     }
     if (kind != BinaryKind::data && kind != BinaryKind::ascii)
-        return fail("an object of unknown type");
+        return leaveOut(value, "an object of unknown type");
     if (!charge(count))
         return false;
     const BytesView content = in.take(count);
@@ -183,7 +195,7 @@ bool Reader::readCounted(BinaryKind kind, std::uint64_t count, ByteReader& in, V
         return true;
     }
     if (!isASCII(textOf(content)))
-        return fail("a text is not ASCII");
+        return leaveOut(value, "a text is not ASCII");
     value = std::string(textOf(content));
     return true;
 }
@@ -221,12 +233,17 @@ bool Reader::readDictionary(BytesView references, int depth, Value& value)
         if (!readObject(reference(references, i), depth + 1, key))
             return false;
         auto* text = key.get<std::string>();
-        if (text == nullptr)
-            return fail("a key is not a text");
+        if (text == nullptr) {
+            if (!isLenient_)
+                return fail("a key is not a text");
+            continue;
+        }
         // Most writers sort the keys: then each belongs at the end. Of two equal ones the last is read over the first.
         const auto entry = dictionary.try_emplace(dictionary.end(), std::move(*text));
         if (!readObject(reference(references, count + i), depth + 1, entry->second))
             return false;
+        if (entry->second.isNull())
+            dictionary.erase(entry);
     }
     value = std::move(dictionary);
     return true;
@@ -241,9 +258,9 @@ void BinaryTrailer::swap()
     offsetTableOffset.swap();
 }
 
-bool readBinary(BytesView bytes, Value& value, std::string& problem)
+bool readBinary(BytesView bytes, Value& value, std::string& problem, PropertyListReading reading)
 {
-    return Reader(bytes, problem).read(value);
+    return Reader(bytes, problem, reading).read(value);
 }
 
 } // namespace platform::plist

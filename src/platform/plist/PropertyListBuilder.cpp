@@ -54,10 +54,32 @@ bool parseReal(std::string_view text, double& result)
     return error == std::errc() && end == text.data() + text.size();
 }
 
-/// ISO 8601 as property lists have it: "2026-11-21T12:30:00Z".
+/// The digits of a fraction of a second: "25" is a quarter. False for what is none.
+bool parseFraction(std::string_view digits, double& fraction)
+{
+    double scale = 1;
+    for (const char c : digits) {
+        if (c < '0' || c > '9')
+            return false;
+        fraction += (c - '0') * (scale /= 10);
+    }
+    return !digits.empty();
+}
+
+/// ISO 8601 as property lists have it, "2026-11-21T12:30:00Z", also with a fraction of a second ahead of the "Z", as
+/// some writers have it.
 bool parseDate(std::string_view text, Date& result)
 {
-    constexpr std::string_view pattern = "dddd-dd-ddTdd:dd:ddZ";
+    constexpr std::string_view pattern = "dddd-dd-ddTdd:dd:dd";
+    if (!text.ends_with('Z'))
+        return false;
+    text.remove_suffix(1);
+    double fraction = 0;
+    if (text.size() > pattern.size()) {
+        if (text[pattern.size()] != '.' || !parseFraction(text.substr(pattern.size() + 1), fraction))
+            return false;
+        text = text.substr(0, pattern.size());
+    }
     const auto matches = [](char c, char p) { return p == 'd' ? c >= '0' && c <= '9' : c == p; };
     if (!std::equal(text.begin(), text.end(), pattern.begin(), pattern.end(), matches))
         return false;
@@ -75,7 +97,7 @@ bool parseDate(std::string_view text, Date& result)
     if (!day.ok() || day.year() < year(1) || h > 23 || m > 59 || s > 59)
         return false;
     const auto days = sys_days(day) - sys_days(year(2001) / January / 1);
-    result.secondsSince2001 = static_cast<double>(seconds(days).count() + h * 3600 + m * 60 + s);
+    result.secondsSince2001 = static_cast<double>(seconds(days).count() + h * 3600 + m * 60 + s) + fraction;
     return true;
 }
 
@@ -226,8 +248,11 @@ bool Builder::endLeaf()
         containers_.back().hasKey = true;
     } else {
         Value value;
-        if (!leafValue(value))
-            return false;
+        if (!leafValue(value)) {
+            if (!isLenient_)
+                return false;
+            problem_.clear();
+        }
         add(std::move(value));
     }
     leaf_ = Element::none;
@@ -248,26 +273,34 @@ bool Builder::leafValue(Value& value)
     case Element::integer: {
         std::int64_t integer = 0;
         const bool ok = parseInteger(text, integer);
-        value = integer;
-        return ok || fail("not an integer of 64 bits");
+        double real = 0;
+        const bool isLong = !ok && isLenient_ && text.find_first_not_of("+-0123456789") == text.npos;
+        if (ok)
+            value = integer;
+        else if (isLong && parseReal(text, real))
+            value = real;
+        return !value.isNull() || fail("not an integer of 64 bits");
     }
     case Element::real: {
         double real = 0;
-        const bool ok = parseReal(text, real);
+        if (!parseReal(text, real))
+            return fail("not a real number");
         value = real;
-        return ok || fail("not a real number");
+        return true;
     }
     case Element::date: {
         Date date;
-        const bool ok = parseDate(text, date);
+        if (!parseDate(text, date))
+            return fail("not a date");
         value = date;
-        return ok || fail("not a date");
+        return true;
     }
     default: {
         Bytes data;
-        const bool ok = parseBase64(text, data);
+        if (!parseBase64(text, data))
+            return fail("data is not base 64");
         value = std::move(data);
-        return ok || fail("data is not base 64");
+        return true;
     }
     }
 }
@@ -284,8 +317,9 @@ void Builder::add(Value value)
         container.array.push_back(std::move(value));
         return;
     }
-    container.dictionary.insert_or_assign(container.dictionary.end(), std::move(container.key), std::move(value));
     container.hasKey = false;
+    if (!value.isNull()) // one that could not be read
+        container.dictionary.insert_or_assign(container.dictionary.end(), std::move(container.key), std::move(value));
 }
 
 } // namespace platform::plist

@@ -2,7 +2,7 @@
 // means.
 #pragma once
 
-#include "platform/core/Value.h"
+#include "platform/PropertyList.h"
 
 #include <cstdint>
 #include <string>
@@ -14,6 +14,8 @@ namespace platform::plist {
 /// Takes the events of a well-formed document in order. The first `false` ends the work; `problem()` says why.
 class Builder {
 public:
+    explicit Builder(PropertyListReading reading) : isLenient_(reading == PropertyListReading::lenient) {}
+
     bool startElement(std::string_view name);
     bool endElement();
     bool characters(std::string_view text);
@@ -40,6 +42,7 @@ private:
     bool leafValue(Value& value);
     void add(Value value);
 
+    const bool isLenient_;
     std::vector<Container> containers_;
     Element leaf_ = Element::none; // the element without children that is open
     std::string text_;             // of the leaf

@@ -11,7 +11,7 @@ namespace {
 /// Hands the events of a document to a Builder, and ends the parse when it fails.
 class Reader final : public XMLHandler {
 public:
-    explicit Reader(InputStream& stream) : parser_(stream, *this)
+    Reader(InputStream& stream, PropertyListReading reading) : builder_(reading), parser_(stream, *this)
     {
         parser_.setMaximumDepth(kPropertyListMaximumDepth + 2); // "plist" around them all, a leaf within
     }
@@ -50,10 +50,10 @@ private:
 
 } // namespace
 
-bool readXML(BytesView bytes, Value& value, std::string& problem)
+bool readXML(BytesView bytes, Value& value, std::string& problem, PropertyListReading reading)
 {
     BorrowedInputStream stream(bytes);
-    return Reader(stream).read(value, problem);
+    return Reader(stream, reading).read(value, problem);
 }
 
 } // namespace platform::plist

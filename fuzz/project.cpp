@@ -9,6 +9,8 @@
 #include <cstdint>
 #include <cstdlib>
 #include <cstring>
+#include <string>
+#include <vector>
 
 using namespace platform;
 
@@ -76,10 +78,16 @@ void useMemory()
 
 void requireAbsolute(const ProjectFileSet& files)
 {
-    for (const std::string_view file : files) {
-        require(file.starts_with('/') && file.find('\0') == file.npos && file.find("//") == file.npos);
-        require(file.find("/../") == file.npos && !file.ends_with("/.."));
-    }
+    for (const std::string_view file : files)
+        require(file.starts_with('/') && file.find('\0') == file.npos);
+}
+
+/// One that is stored as an absolute path is used as it is, whatever it holds; what was made absolute is standardized.
+void requireStandardized(const ProjectFileSet& files, const std::vector<std::string>& stored)
+{
+    for (const std::string_view file : files)
+        require(std::find(stored.begin(), stored.end(), file) != stored.end() ||
+                (file.find("//") == file.npos && file.find("/../") == file.npos && !file.ends_with("/..")));
 }
 
 } // namespace
@@ -101,8 +109,11 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
             require(project->alternativeNames().contains(key));
         for (const long index : {-1L, 0L, 7L, project->lastActiveVariation()}) {
             project->variationNameForIndex(index);
-            for (const ProjectMediaList& list : kProjectMediaLists)
-                requireAbsolute(project->filesUsedByVariantIndex(list.kind, index));
+            for (const ProjectMediaList& list : kProjectMediaLists) {
+                const ProjectFileSet files = project->filesUsedByVariantIndex(list.kind, index);
+                requireAbsolute(files);
+                requireStandardized(files, project->relativeFilepathsUsedByVariantIndex(list.kind, index));
+            }
             project->beatsPerMinute(index);
             project->sampleRate(index);
             project->songKeyAsNonLocalizedString(index);
@@ -113,6 +124,7 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
     }
     ProjectInformation::interruptedExchangeForBundleURL(url, 0);
     const auto base = ProjectInformation::backupsBaseURLForBundleURL(url, 0, CreateDirectories::no);
+    ProjectInformation::settleInterruptedExchangeForBundleURL(url, 0, SettleExchange::undo);
     ProjectInformation::exchangeDataOfProjectAtURL(url, 0, base->appendingPathComponent(String::fromUTF8("00"), true));
     return 0;
 }

@@ -6,20 +6,22 @@
 #include "Progress.h"
 #include "ProjectEdit.h"
 #include "ProjectPackage.h"
+#include "UnfinishedBackup.h"
+
+#include <fmt/format.h>
 
 #include <cerrno>
 #include <fcntl.h>
 #include <filesystem>
 #include <sys/stat.h>
+#include <unistd.h>
 
 namespace fs = std::filesystem;
 
 namespace {
 
 constexpr const char* kBackedUp[] = {"ProjectData", "MetaData.plist", "ARA Files"};
-/// Hidden, so that a backup of which half is there is none. Edits of a package wait for each other: one that is there
-/// was left by a process that was killed.
-constexpr const char* kUnfinished = ".ktfiles-backup";
+constexpr int kMostBackups = 100; // that two digits name
 
 [[noreturn]] void failWithErrno()
 {
@@ -32,9 +34,25 @@ void requireNoEnd()
         throw Failure("interrupted");
 }
 
+/// Everything but an owner that this user may not give away.
+void keepAttributes(int from, struct stat status, int to)
+{
+    struct stat own = {};
+    if (::fstat(to, &own) != 0)
+        failWithErrno();
+    if (::geteuid() != 0 && (own.st_uid != status.st_uid || own.st_gid != status.st_gid)) {
+        status.st_uid = own.st_uid;
+        status.st_gid = own.st_gid;
+        status.st_mode &= ~static_cast<mode_t>(S_ISUID | S_ISGID);
+    }
+    copyAttributes(from, status, to);
+    synchronize(to);
+}
+
+/// A link is followed: what it leads to is what the backup is for.
 void copyFile(const fs::path& from, const fs::path& to, bool quiet)
 {
-    const Descriptor source(::open(from.c_str(), O_RDONLY | O_CLOEXEC | O_NOFOLLOW | O_NONBLOCK));
+    const Descriptor source(::open(from.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK));
     struct stat status = {};
     if (!source || ::fstat(source.get(), &status) != 0)
         failWithErrno();
@@ -45,74 +63,98 @@ void copyFile(const fs::path& from, const fs::path& to, bool quiet)
         failWithErrno();
     Progress progress(from.filename().string(), status.st_size, quiet);
     copyContent(source.get(), target.get(), progress);
-    copyAttributes(source.get(), status, target.get());
-    synchronize(target.get());
+    keepAttributes(source.get(), status, target.get());
     requireNoEnd();
 }
 
+void copyItem(const fs::path& from, const fs::path& to, bool quiet);
+
+/// The attributes come last, so that what is in a read-only folder can be copied too.
 // NOLINTNEXTLINE(misc-no-recursion): no deeper than the folders are
+void copyFolder(const fs::path& from, const fs::path& to, bool quiet)
+{
+    const Descriptor source(::open(from.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
+    struct stat status = {};
+    if (!source || ::fstat(source.get(), &status) != 0 || ::mkdir(to.c_str(), 0700) != 0)
+        failWithErrno();
+    for (const fs::directory_entry& entry : fs::directory_iterator(from))
+        copyItem(entry.path(), to / entry.path().filename(), quiet);
+    const Descriptor target(::open(to.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
+    if (!target)
+        failWithErrno();
+    keepAttributes(source.get(), status, target.get());
+}
+
+// NOLINTNEXTLINE(misc-no-recursion)
 void copyItem(const fs::path& from, const fs::path& to, bool quiet)
 {
-    const fs::file_status status = fs::symlink_status(from);
-    if (fs::is_symlink(status)) {
-        fs::copy_symlink(from, to);
-    } else if (fs::is_directory(status)) {
-        fs::create_directory(to, from);
-        for (const fs::directory_entry& entry : fs::directory_iterator(from))
-            copyItem(entry.path(), to / entry.path().filename(), quiet);
-    } else {
+    const bool isLink = fs::is_symlink(fs::symlink_status(from));
+    const fs::file_status leadsTo = fs::status(from);
+    if (isLink && !fs::is_regular_file(leadsTo)) // a folder could be one around it
+        throw Failure(from.filename().string() + " is a link, and not to a file: a backup would hold the link alone");
+    if (fs::is_directory(leadsTo))
+        copyFolder(from, to, quiet);
+    else
         copyFile(from, to, quiet);
-    }
 }
 
 void copyAlternative(const fs::path& alternative, const fs::path& unfinished, bool quiet)
 {
-    fs::create_directories(unfinished.parent_path());
-    fs::remove_all(unfinished);
-    fs::create_directory(unfinished);
-    for (const char* item : kBackedUp)
-        if (fs::symlink_status(alternative / item).type() != fs::file_type::not_found)
-            copyItem(alternative / item, unfinished / item, quiet);
+    for (const char* name : kBackedUp) {
+        const fs::path item = alternative / name;
+        if (fs::symlink_status(item).type() == fs::file_type::not_found)
+            continue;
+        if (fs::is_symlink(fs::symlink_status(item)) && fs::is_directory(item))
+            copyFolder(fs::canonical(item), unfinished / name, quiet);
+        else
+            copyItem(item, unfinished / name, quiet);
+    }
 }
 
-/// Old backups go only when the new one is whole.
-std::string publish(const fs::path& unfinished, const platform::URLRef& package, long alternative, int keep,
-                    PurgeOldBackups purge)
+/// The name that the backup has taken. Only when there is none are old ones deleted first.
+platform::URLRef publish(UnfinishedBackup& unfinished, const platform::URLRef& package, long alternative, int keep)
 {
-    const platform::URLRef backup =
-        ProjectInformation::urlForNewBackupForBundleURL(package, alternative, CreateDirectories::no, keep, purge);
-    if (!backup)
-        throw Failure("there is no room for another backup: --keep says how many there may be, the oldest go");
-    fs::rename(unfinished, backup->posixPath()); // over an empty folder at most
-    synchronizeFolderOf(backup->posixPath().c_str());
-    return backupName(backup);
+    constexpr int kMostAttempts = 10; // somebody may take the name, who knows nothing of coordination
+    for (int attempt = 0; attempt < kMostAttempts; ++attempt) {
+        const auto name = [&](PurgeOldBackups purge) {
+            return ProjectInformation::urlForNewBackupForBundleURL(package, alternative, CreateDirectories::no,
+                                                                   kMostBackups, purge);
+        };
+        platform::URLRef backup = name(PurgeOldBackups::no);
+        if (!backup && keep > 0)
+            backup = name(PurgeOldBackups::yes);
+        if (!backup)
+            break;
+        if (unfinished.publish(backup->posixPath()))
+            return backup;
+    }
+    throw Failure("there is no room for another backup: --keep says how many there may be, the oldest go");
 }
 
 } // namespace
 
-std::string makeBackup(const ProjectInformation& project, long alternative, int keep, PurgeOldBackups purge,
-                       bool dryRun, bool quiet)
+std::string makeBackup(const ProjectInformation& project, long alternative, int keep, bool dryRun, bool quiet)
 {
     const platform::URLRef& package = project.projectURL();
     const auto folder = project.pathForVariant(alternative, AcceptMissing::no);
     if (!folder || !fs::exists(fs::path(*folder) / "ProjectData"))
         throw Failure("its alternative has no project data");
     if (ProjectInformation::interruptedExchangeForBundleURL(package, alternative))
-        throw Failure("an exchange with a backup was cut short: restore settles it");
+        throw Failure("an exchange with a backup was cut short: project restore or project settle ends it");
+    const auto backups = ProjectInformation::backupsBaseURLForBundleURL(package, alternative, CreateDirectories::no);
+    requireNoLink(package->posixPath(), backups->posixPath());
     if (dryRun)
         return {};
-    const auto backups = ProjectInformation::backupsBaseURLForBundleURL(package, alternative, CreateDirectories::no);
-    const fs::path unfinished = fs::path(backups->posixPath()) / kUnfinished;
+    platform::URLRef backup;
     try {
-        copyAlternative(*folder, unfinished, quiet);
-        return publish(unfinished, package, alternative, keep, purge);
+        UnfinishedBackup unfinished(backups->posixPath());
+        copyAlternative(*folder, unfinished.path(), quiet);
+        backup = publish(unfinished, package, alternative, keep);
     } catch (const fs::filesystem_error& error) {
-        std::error_code ignored;
-        fs::remove_all(unfinished, ignored);
         throw Failure(systemErrorText(error.code().value()));
-    } catch (...) {
-        std::error_code ignored;
-        fs::remove_all(unfinished, ignored);
-        throw;
     }
+    if (keep > 0 && !ProjectInformation::purgeBackupsForBundleURL(package, alternative, keep, backup))
+        throw Failure(fmt::format("backup {} was made, but not all old ones can be deleted: {}", backupName(backup),
+                                  systemErrorText(errno)));
+    return backupName(backup);
 }

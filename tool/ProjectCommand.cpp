@@ -1,11 +1,14 @@
 // ktfiles project: project packages, what they say of themselves, their media, folders and backups.
 #include "CommandLine.h"
 #include "Failure.h"
+#include "ProjectArguments.h"
 #include "ProjectBackup.h"
 #include "ProjectEdit.h"
 #include "ProjectMedia.h"
 #include "ProjectPackage.h"
 #include "ProjectReport.h"
+#include "ProjectRestore.h"
+#include "TimeoutOption.h"
 #include "platform/ApplicationInfo.h"
 
 #include <nlohmann/json.hpp>
@@ -16,16 +19,6 @@
 namespace {
 
 constexpr int kMostBackups = 100; // that two digits name
-
-struct ProjectArguments {
-    std::string package, backup, name;
-    std::optional<long> alternative;
-    long index = 0;
-    int keep = 0;
-    bool missing = false;
-    bool create = false;
-    EditOptions edit;
-};
 
 /// Failures go to standard error, and into the JSON where that is asked for.
 bool runOn(const std::string& path, const OutputOptions& output, const std::function<void()>& work)
@@ -44,89 +37,34 @@ bool runOn(const std::string& path, const OutputOptions& output, const std::func
     });
 }
 
-/// `json` without the path; `sentence` for people and pipes alike.
-void report(const std::string& path, const OutputOptions& options, nlohmann::ordered_json json,
-            const std::string& sentence)
-{
-    if (options.json) {
-        nlohmann::ordered_json object{{"path", path}};
-        object.update(json);
-        Output::standard().print("{}\n", jsonText(object));
-    } else if (!options.quiet) {
-        Output::standard().print("{}: {}\n", printable(path), sentence);
-    }
-}
-
 void backUp(const ProjectArguments& arguments, const OutputOptions& output)
 {
-    editProject(arguments.package, [&] {
-        const auto project = openProject(arguments.package);
+    editProject(arguments.package, arguments.wait, [&](const std::string& package) {
+        const auto project = openProject(package);
         const long alternative = alternativeOf(*project, arguments.alternative);
-        const auto purge = arguments.keep > 0 ? PurgeOldBackups::yes : PurgeOldBackups::no;
-        const std::string name = makeBackup(*project, alternative, arguments.keep > 0 ? arguments.keep : kMostBackups,
-                                            purge, arguments.edit.dryRun, output.quiet);
+        const std::string name = makeBackup(*project, alternative, arguments.keep, arguments.edit.dryRun, output.quiet);
         nlohmann::ordered_json json{{"alternative", alternative}, {"dryRun", arguments.edit.dryRun}};
         if (!name.empty())
             json["backup"] = name;
-        report(arguments.package, output, json,
-               name.empty() ? fmt::format("would copy alternative {} to a new backup", alternative)
-                            : fmt::format("copied alternative {} to backup {}", alternative, name));
-    });
-}
-
-platform::URLRef backupNamed(const ProjectInformation& project, long alternative, const std::string& name)
-{
-    const auto base =
-        ProjectInformation::backupsBaseURLForBundleURL(project.projectURL(), alternative, CreateDirectories::no);
-    const bool isName = !name.starts_with('.') && name.find('/') == name.npos;
-    auto url = base && isName ? base->appendingPathComponent(platform::String::fromUTF8(name), true) : nullptr;
-    if (!url || !std::filesystem::is_directory(url->posixPath()))
-        throw Failure(fmt::format("alternative {} has no backup \"{}\"", alternative, name));
-    return url;
-}
-
-void restore(const ProjectArguments& arguments, const OutputOptions& output)
-{
-    editProject(arguments.package, [&] {
-        const auto project = openProject(arguments.package);
-        const long alternative = alternativeOf(*project, arguments.alternative);
-        const platform::URLRef backup = backupNamed(*project, alternative, arguments.backup);
-        const auto interrupted =
-            ProjectInformation::interruptedExchangeForBundleURL(project->projectURL(), alternative);
-        const bool completes = interrupted && *interrupted->backupURL == *backup;
-        platform::Error error;
-        if (!arguments.edit.dryRun &&
-            !ProjectInformation::exchangeDataOfProjectAtURL(project->projectURL(), alternative, backup, &error))
-            throw Failure(error.description);
-        std::string sentence;
-        if (interrupted)
-            sentence = fmt::format("found an exchange with backup {} that was cut short; {}; ",
-                                   backupName(interrupted->backupURL),
-                                   arguments.edit.dryRun ? (completes ? "would complete it" : "would undo it")
-                                   : completes           ? "completed it"
-                                                         : "undid it");
-        sentence += fmt::format("alternative {} {} the data of backup {}, which {} what the alternative had",
-                                alternative, arguments.edit.dryRun ? "would have" : "has", backupName(backup),
-                                arguments.edit.dryRun ? "would have" : "has");
-        nlohmann::ordered_json json{
-            {"alternative", alternative}, {"backup", backupName(backup)}, {"dryRun", arguments.edit.dryRun}};
-        if (interrupted)
-            json["interruptedExchange"] = backupName(interrupted->backupURL);
-        report(arguments.package, output, json, printable(sentence));
+        printProjectEdit(arguments.package, output, json,
+                         name.empty() ? fmt::format("would copy alternative {} to a new backup", alternative)
+                                      : fmt::format("copied alternative {} to backup {}", alternative, name));
     });
 }
 
 void renameAlternative(const ProjectArguments& arguments, const OutputOptions& output)
 {
-    editProject(arguments.package, [&] {
-        const auto project = openProject(arguments.package);
+    editProject(arguments.package, arguments.wait, [&](const std::string& package) {
+        const auto project = openProject(package);
         const auto url =
             ProjectInformation::projectInformationURLForBundleURL(project->projectURL(), CreateDirectories::no);
         SafeEdit edit(url->posixPath(), arguments.edit); // ahead of the reading, so that it notices other changes
         auto info = ProjectInformation::infoDictionaryFromProjectBundleURL(project->projectURL());
         auto names = project->alternativeNames();
         const auto found = names.find(std::to_string(arguments.index));
-        if (!info || found == names.end())
+        if (!info)
+            throw Failure("Resources/ProjectInformation.plist holds a value that would not be kept");
+        if (found == names.end())
             throw Failure(fmt::format("has no alternative {}", arguments.index));
         const std::string before = project->variationNameForIndex(arguments.index).value_or("");
         found->second = arguments.name;
@@ -148,10 +86,10 @@ void renameAlternative(const ProjectArguments& arguments, const OutputOptions& o
                                     {"dryRun", arguments.edit.dryRun}};
         if (!backup.empty())
             json["backup"] = backup;
-        report(arguments.package, output, json,
-               fmt::format("alternative {} {} \"{}\"{}", arguments.index,
-                           arguments.edit.dryRun ? "would be called" : "is called", printable(arguments.name),
-                           backup.empty() ? "" : ", the old names are in " + printable(backup)));
+        printProjectEdit(arguments.package, output, json,
+                         fmt::format("alternative {} {} \"{}\"{}", arguments.index,
+                                     arguments.edit.dryRun ? "would be called" : "is called", printable(arguments.name),
+                                     backup.empty() ? "" : ", the old names are in " + printable(backup)));
     });
 }
 
@@ -194,19 +132,21 @@ void declareReading(CommandLine& commandLine, CLI::App& project, ProjectArgument
         "dirs", "List a project's media and working folders, or create them",
         [&] {
             return runOn(arguments.package, output, [&] {
-                const auto print = [&] {
-                    printProjectDirectories(arguments.package, arguments.alternative, arguments.create, output);
+                const auto print = [&](const std::string& package) {
+                    printProjectDirectories(arguments.package, projectFolder(package), arguments.alternative,
+                                            arguments.create, output);
                 };
                 if (arguments.create)
-                    editProject(arguments.package, print);
+                    editProject(arguments.package, arguments.wait, print);
                 else
-                    print();
+                    print(arguments.package);
             });
         },
         &project);
     addPackage(dirs, arguments);
     dirs.add_flag("--create", arguments.create, "Create those that are missing");
     addAlternative(dirs, arguments);
+    addTimeout(dirs, arguments.wait.timeoutSeconds);
 }
 
 void declareEdits(CommandLine& commandLine, CLI::App& project, ProjectArguments& arguments)
@@ -217,11 +157,12 @@ void declareEdits(CommandLine& commandLine, CLI::App& project, ProjectArguments&
         CLI::App& verb = commandLine.addVerb(
             name, description,
             [&, work] {
-                arguments.edit.quiet = output.quiet;
+                arguments.edit.quiet = arguments.wait.quiet = output.quiet;
                 return runOn(arguments.package, output, [&] { work(arguments, output); });
             },
             &project);
         addPackage(verb, arguments);
+        addTimeout(verb, arguments.wait.timeoutSeconds);
         return verb;
     };
     CLI::App& backup = edit("backup", "Back up an alternative's project data", backUp);
@@ -231,10 +172,21 @@ void declareEdits(CommandLine& commandLine, CLI::App& project, ProjectArguments&
         ->check(CLI::Range(1, kMostBackups).description(""));
     backup.add_flag("--dry-run", arguments.edit.dryRun, "Say what would be done, and do nothing");
 
-    CLI::App& back = edit("restore", "Exchange an alternative's project data with a backup's", restore);
+    CLI::App& back = edit("restore", "Exchange an alternative's project data with a backup's", restoreBackup);
     back.add_option("BACKUP", arguments.backup, "The backup's name, such as 03")->option_text(" ")->required();
     addAlternative(back, arguments);
     back.add_flag("--dry-run", arguments.edit.dryRun, "Say what would be done, and do nothing");
+
+    CLI::App& settle =
+        edit("settle", "Complete an exchange with a backup that was cut short, or undo it", settleExchange);
+    CLI::Option* undo = settle.add_flag("--undo", arguments.undo, "Put everything back to where it was");
+    settle.add_flag("--forget", arguments.forget, "Leave everything where it is, and drop the record of the exchange")
+        ->excludes(undo);
+    CommandLine::addPath(settle, "--with", arguments.backup,
+                         "The backup's folder, where the record names one elsewhere")
+        ->option_text("FOLDER");
+    addAlternative(settle, arguments);
+    settle.add_flag("--dry-run", arguments.edit.dryRun, "Say what would be done, and do nothing");
 
     CLI::App& rename = edit("rename-alternative", "Give an alternative another name", renameAlternative);
     rename.add_option("N", arguments.index, "The alternative's number")

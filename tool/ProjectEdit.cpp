@@ -1,21 +1,16 @@
 #include "ProjectEdit.h"
 
-#include "Descriptor.h"
-#include "Failure.h"
 #include "FileAccess.h"
+#include "ProjectPackage.h"
 #include "TemporaryFile.h"
 
-#include <cerrno>
-#include <fcntl.h>
-
-void editProject(const std::string& package, const std::function<void()>& edit)
+void editProject(const std::string& package, const WaitOptions& wait,
+                 const std::function<void(const std::string& package)>& edit)
 {
-    const Descriptor folder(::open(package.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
-    if (!folder)
-        throw Failure(systemErrorText(errno));
-    const FileAccess access = accessForWriting(package, platform::FileCoordinator::WritingOptions::none, {});
+    const std::string resolved = resolvedFolder(package);
+    const FileAccess access = accessForWriting(resolved, platform::FileCoordinator::WritingOptions::none, wait);
     const SignalHold hold;
-    edit();
+    edit(resolved);
 }
 
 bool endIsWanted()

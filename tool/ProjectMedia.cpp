@@ -66,10 +66,9 @@ void printProjectMedia(const std::string& path, ProjectInformation& project, std
     printRows(rows, {{"KIND"}, {"STATE"}, {"FILE"}}, options);
 }
 
-void printProjectDirectories(const std::string& path, std::optional<long> alternative, bool create,
-                             const OutputOptions& options)
+void printProjectDirectories(const std::string& path, const CFileRef& base, std::optional<long> alternative,
+                             bool create, const OutputOptions& options)
 {
-    const CFileRef base = projectFolder(path);
     const auto project = ProjectInformation::initWithProjectURL(base.URL());
     const long index = alternative.value_or(project ? std::max(project->lastActiveVariation(), 0L) : 0);
     std::vector<std::vector<std::string>> rows;

@@ -2,6 +2,7 @@
 #pragma once
 
 #include "Output.h"
+#include "files/CFileRef.h"
 #include "project/ProjectInformation.h"
 
 #include <optional>
@@ -10,6 +11,6 @@
 void printProjectMedia(const std::string& path, ProjectInformation& project, std::optional<long> alternative,
                        bool onlyMissing, const OutputOptions& options);
 
-/// Of any kind of project; created first where that is asked for. Throws Failure.
-void printProjectDirectories(const std::string& path, std::optional<long> alternative, bool create,
-                             const OutputOptions& options);
+/// Of any kind of project, whose folder is `base`; created first where that is asked for. Throws Failure.
+void printProjectDirectories(const std::string& path, const CFileRef& base, std::optional<long> alternative,
+                             bool create, const OutputOptions& options);

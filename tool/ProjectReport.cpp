@@ -85,7 +85,9 @@ ordered_json jsonOf(ProjectInformation& project, const AlternativeReport& report
     for (const ProjectBackup& backup : report.backups)
         object["backups"].push_back({{"name", backupName(backup.url)}, {"date", dateText(backup.date)}});
     if (report.interrupted)
-        object["interruptedExchange"] = backupName(report.interrupted->backupURL);
+        object["interruptedExchange"] = report.interrupted->backupURL
+                                            ? ordered_json(backupName(*report.interrupted, project, *report.index))
+                                            : ordered_json();
     return object;
 }
 
@@ -124,8 +126,10 @@ void printTable(const AlternativeReport& report, ProjectInformation& project, bo
     for (const ProjectBackup& backup : report.backups)
         output.print("       backup {}  {}\n", printable(backupName(backup.url)), dateText(backup.date));
     if (report.interrupted)
-        output.print("       an exchange with backup {} was cut short: the next restore settles it\n",
-                     printable(backupName(report.interrupted->backupURL)));
+        output.print("       an exchange with {} was cut short: project restore or project settle ends it\n",
+                     report.interrupted->backupURL
+                         ? "backup " + printable(backupName(*report.interrupted, project, *report.index))
+                         : "an unknown backup");
 }
 
 /// By line: index, whether it is active, name, tempo, key, mode, signature, tracks, rate, media, missing, backups.
@@ -214,4 +218,16 @@ void printProject(const std::string& path, ProjectInformation& project, const Ou
         output.print("{}\n", jsonText({{"path", path},
                                        {"projectInfo", projectJson(project.projectInfo())},
                                        {"alternatives", std::move(alternatives)}}));
+}
+
+void printProjectEdit(const std::string& path, const OutputOptions& options, const ordered_json& json,
+                      const std::string& sentence)
+{
+    if (options.json) {
+        ordered_json object{{"path", path}};
+        object.update(json);
+        Output::standard().print("{}\n", jsonText(object));
+    } else if (!options.quiet) {
+        Output::standard().print("{}: {}\n", printable(path), sentence);
+    }
 }

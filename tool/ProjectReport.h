@@ -11,4 +11,8 @@ nlohmann::ordered_json projectJson(const platform::Value& value);
 /// "2026-11-21T09:30:00Z".
 std::string dateText(platform::Date date);
 
+/// What an edit has done: `json` without the path; `sentence` for people and pipes alike.
+void printProjectEdit(const std::string& path, const OutputOptions& options, const nlohmann::ordered_json& json,
+                      const std::string& sentence);
+
 void printProject(const std::string& path, ProjectInformation& project, const OutputOptions& options);

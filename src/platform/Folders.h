@@ -18,7 +18,8 @@ KT_EXPORT std::optional<std::vector<std::string>> namesInFolder(const std::strin
 /// Creates a folder and those above it, as far as they are missing. A symbolic link to a folder is one.
 KT_EXPORT bool createFolders(const std::string& path);
 
-/// Removes an item with all that is in it. No link is followed, and no other file system entered.
+/// Removes an item with all that is in it, read-only folders too. No link is followed, and no other file system
+/// entered.
 KT_EXPORT bool removeTree(const std::string& path);
 
 /// When the content of the item was last changed, links followed; null when it cannot be had.

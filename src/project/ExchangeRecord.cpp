@@ -36,7 +36,7 @@ Bytes ExchangeRecord::bytes() const
 
 std::optional<ExchangeRecord> ExchangeRecord::fromBytes(BytesView bytes)
 {
-    const auto dictionary = dictionaryFromBytes(bytes);
+    const auto dictionary = dictionaryFromBytes(bytes, platform::PropertyListReading::strict);
     const auto* backup = dictionary ? platform::find<std::string>(*dictionary, kBackupKey) : nullptr;
     const auto* pairs = dictionary ? platform::find<Array>(*dictionary, kItemsKey) : nullptr;
     if (backup == nullptr || pairs == nullptr || pairs->size() != kExchangedNames.size() ||

@@ -1,6 +1,7 @@
 #include "project/ProjectDirectories.h"
 
 #include "platform/Folders.h"
+#include "platform/SystemCalls.h"
 #include "platform/core/ASCIICase.h"
 #include "project/ProjectInformation.h"
 #include "project/ProjectLayout.h"
@@ -89,6 +90,8 @@ std::string pathIn(const CFileRef& folder, const char* name)
 
 const char* olderName(ProjectDirectoryType type, std::size_t wanted)
 {
+    if (wanted >= kOlderDirectories.size())
+        return nullptr;
     const OlderDirectory& names = kOlderDirectories[wanted];
     return type == kProjectDirectoryOldBand ? names.band : type == kProjectDirectoryMwand ? names.mwand : names.plain;
 }
@@ -96,6 +99,13 @@ const char* olderName(ProjectDirectoryType type, std::size_t wanted)
 URLRef parentOf(const URLRef& url)
 {
     return url ? url->deletingLastPathComponent() : nullptr;
+}
+
+/// Whether the name is there, also as a link to nothing.
+bool entryExists(const std::string& path)
+{
+    platform::FileStatus status;
+    return !path.empty() && platform::systemCalls().linkStatus(path.c_str(), &status);
 }
 
 /// `name` may be empty, for the folder itself.
@@ -136,7 +146,7 @@ ProjectDirectoryType GetProjectDirectoryType(const CFileRef& project)
     if (equalIgnoringASCIICase(extension, "grid"))
         return kProjectDirectoryGrid;
     if (equalIgnoringASCIICase(extension, "concert"))
-        return itemExists(pathIn(project, "isProject")) ? kProjectDirectoryConcertProject : kProjectDirectoryConcert;
+        return entryExists(pathIn(project, "isProject")) ? kProjectDirectoryConcertProject : kProjectDirectoryConcert;
     return kProjectDirectoryPlain;
 }
 
@@ -153,8 +163,7 @@ CFileRef GetProjectDirectoryRefForBase(const CFileRef& base, TTypeDir_Prj type, 
 {
     const ProjectDirectoryType kind = GetProjectDirectoryType(base);
     const auto wanted = static_cast<std::size_t>(type);
-    if (base.GetPath() == nullptr || wanted >= kPackageDirectories.size() || layout < kProjectTypeFromProject ||
-        layout > kProjectTypeProjectFolder)
+    if (base.GetPath() == nullptr || layout < kProjectTypeFromProject || layout > kProjectTypeProjectFolder)
         return CFileRef();
     const URLRef package = platform::URL::createWithFileSystemPath(String::fromFileSystemRepresentation(base.GetPath()),
                                                                    platform::PathStyle::posix, true);
@@ -165,7 +174,8 @@ CFileRef GetProjectDirectoryRefForBase(const CFileRef& base, TTypeDir_Prj type, 
         const char* name = olderName(kind, wanted);
         directory = name != nullptr ? below(package, name) : nullptr;
     } else {
-        const PackageDirectory& names = kPackageDirectories[wanted];
+        const PackageDirectory names =
+            wanted < kPackageDirectories.size() ? kPackageDirectories[wanted] : PackageDirectory();
         if (layout == kProjectTypeFromProject)
             layout = GetProjectLayout(base);
         if (layout == kProjectTypeProjectFolder)
@@ -178,10 +188,11 @@ CFileRef GetProjectDirectoryRefForBase(const CFileRef& base, TTypeDir_Prj type, 
             directory = isInMedia ? below(itemIn(package, ProjectLayout::media, true), names.inside)
                                   : below(root, names.folder);
     }
-    if (!directory)
+    // Kept: the base is created also for what there is no folder for
+    if ((create && !createFolder(root)) || !directory)
         return CFileRef();
-    if (create && !(createFolder(root) && (!isInMedia || createFolder(itemIn(package, ProjectLayout::media, true))) &&
-                    createFolder(directory)))
+    if (create &&
+        !((!isInMedia || createFolder(itemIn(package, ProjectLayout::media, true))) && createFolder(directory)))
         return CFileRef();
     return CFileRef(directory);
 }

@@ -38,7 +38,8 @@ bool comesBefore(const std::string& a, const std::string& b)
 
 std::unique_ptr<ProjectInformation> ProjectInformation::initWithProjectURL(const URLRef& projectURL)
 {
-    std::optional<Dictionary> info = infoDictionaryFromProjectBundleURL(projectURL);
+    std::optional<Dictionary> info =
+        infoDictionaryFromProjectBundleURL(projectURL, platform::PropertyListReading::lenient);
     if (!info)
         return nullptr;
     return std::unique_ptr<ProjectInformation>(new ProjectInformation(projectURL, std::move(*info)));
@@ -92,12 +93,13 @@ const Dictionary* ProjectInformation::loadMetaDataForVariant(long index)
     const std::string& path = pathOf(url);
     if (path.empty())
         return nullptr;
-    // Kept: the backup copy stands in for a file that cannot be read, not for one that says nonsense
-    auto bytes = platform::readSmallFile(path.c_str(), kLargestProjectList);
-    if (!bytes)
-        bytes = platform::readSmallFile((path.substr(0, path.rfind('/') + 1) + ProjectLayout::metaDataCopy).c_str(),
-                                        kLargestProjectList);
-    std::optional<Dictionary> metaData = bytes ? dictionaryFromBytes(*bytes) : std::nullopt;
+    const auto read = [](const std::string& list) {
+        const auto bytes = platform::readSmallFile(list.c_str(), kLargestProjectList);
+        return bytes ? dictionaryFromBytes(*bytes) : std::nullopt;
+    };
+    std::optional<Dictionary> metaData = read(path);
+    if (!metaData)
+        metaData = read(path.substr(0, path.rfind('/') + 1) + ProjectLayout::metaDataCopy);
     if (!metaData)
         return nullptr;
     return metaDataPerVariant_.insert_or_assign(key, std::move(*metaData)).first->second.get<Dictionary>();

@@ -3,6 +3,7 @@
 // back. docs/formats/project-package.md has the format.
 #pragma once
 
+#include "platform/PropertyList.h"
 #include "platform/URL.h"
 #include "platform/core/Error.h"
 #include "platform/core/Value.h"
@@ -29,9 +30,13 @@ struct ProjectBackup {
 
 /// Which backup an exchange of data that was cut short had to do with.
 struct InterruptedProjectExchange {
-    platform::URLRef backupURL;
-    bool isComplete = false; // nothing is left to do but to forget it
+    platform::URLRef backupURL; // null when the record of the exchange cannot be understood
+    bool isComplete = false;    // nothing is left to do but to forget it
 };
+
+/// What is to become of an exchange that was cut short: brought to its end, or back; or left as it stands, all data
+/// where it is, and its record dropped.
+enum class SettleExchange { complete, undo, forget };
 
 /// Owns the dictionaries that it has read; whoever changes a package makes a new object. URLs are taken by reference
 /// and may be null, which gives null. Nothing is believed of a property list: a value of another shape than its key's
@@ -149,9 +154,13 @@ public:
 
     // The information dictionary.
     /// As it is in the file; null for what is no property list of a dictionary.
-    static std::optional<platform::Dictionary> infoDictionaryWithContentsOfURL(const platform::URLRef& url);
+    static std::optional<platform::Dictionary>
+    infoDictionaryWithContentsOfURL(const platform::URLRef& url,
+                                    platform::PropertyListReading reading = platform::PropertyListReading::strict);
     /// Of a package, with both forms of the names; a package that got a new name shows names that follow it.
-    static std::optional<platform::Dictionary> infoDictionaryFromProjectBundleURL(const platform::URLRef& bundleURL);
+    static std::optional<platform::Dictionary>
+    infoDictionaryFromProjectBundleURL(const platform::URLRef& bundleURL,
+                                       platform::PropertyListReading reading = platform::PropertyListReading::strict);
     /// Stamps the version of the layout and the application that saves.
     static void addVersionAndAppInfoToInfoDictionary(platform::Dictionary& info);
     /// What `writeInfoDictionaryToProjectBundleURL` writes: a copy, stamped, with the names in token form.
@@ -202,10 +211,15 @@ public:
     /// Those that hold project data, by date, then by name; hidden folders are none.
     static std::vector<ProjectBackup> backupsForBundleURL(const platform::URLRef& bundleURL, long variantIndex);
     /// Where the next backup goes: a name of two digits, below `maxBackups`, that nothing has. With
-    /// PurgeOldBackups::yes the oldest backups are deleted first, as many as are too many. Null when there is no room.
+    /// PurgeOldBackups::yes the oldest backups are deleted first, as many as are too many; when there is no name
+    /// nothing is. Null when there is no room, and for a folder of backups that lies behind a link in the package.
     static platform::URLRef urlForNewBackupForBundleURL(const platform::URLRef& bundleURL, long variantIndex,
                                                         CreateDirectories create, int maxBackups,
                                                         PurgeOldBackups purgeOldBackups);
+    /// Deletes the oldest backups until `maxBackups` are left, `kept` among them. Of the others the folder that was
+    /// changed last goes last. False, with errno, when one cannot be deleted.
+    static bool purgeBackupsForBundleURL(const platform::URLRef& bundleURL, long variantIndex, int maxBackups,
+                                         const platform::URLRef& kept = nullptr);
     /// The alternative's project data changes places with the backup's, each with its metadata, ARA data and autosave;
     /// the same call once more undoes it. Nothing is copied, and nothing ever replaces anything: cut short at any
     /// point, every item is at one of the two places, and a record in the alternative's folder says what was going on.
@@ -213,13 +227,19 @@ public:
     /// the record is still there.
     ///
     /// The next call settles what it finds recorded, and says so in the log: an exchange with the same backup is
-    /// completed, and is what the call was asked for; one with another backup is undone first. What others have
-    /// replaced meanwhile stays where it is, and the call fails.
+    /// completed, and is what the call was asked for; one with another backup is undone first, unless it had come to
+    /// its end. What others have replaced meanwhile stays where it is, and the call fails. So it does for a backup that
+    /// is a link, or lies behind one in the package.
     static bool exchangeDataOfProjectAtURL(const platform::URLRef& bundleURL, long variantIndex,
                                            const platform::URLRef& backupURL, platform::Error* error = nullptr);
     /// What an exchange that was cut short has left to be settled; null when there is none.
     static std::optional<InterruptedProjectExchange> interruptedExchangeForBundleURL(const platform::URLRef& bundleURL,
                                                                                      long variantIndex);
+    /// Settles it without another exchange. A record that names a backup by its path is followed only when `backupURL`
+    /// leads there too; else that may be null. One that cannot be understood can only be forgotten.
+    static bool settleInterruptedExchangeForBundleURL(const platform::URLRef& bundleURL, long variantIndex,
+                                                      SettleExchange how, const platform::URLRef& backupURL = nullptr,
+                                                      platform::Error* error = nullptr);
 
 private:
     ProjectInformation(platform::URLRef projectURL, platform::Dictionary projectInfo);

@@ -1,32 +1,19 @@
-// Backups of alternatives: listed, named, purged, exchanged with what they are backups of.
+// Backups of alternatives: listed, named, purged.
 #include "platform/Folders.h"
-#include "platform/Log.h"
-#include "platform/SmallFile.h"
 #include "platform/SystemCalls.h"
-#include "platform/core/Status.h"
-#include "project/ProjectErrors.h"
-#include "project/ProjectExchange.h"
 #include "project/ProjectLayout.h"
-#include "project/ProjectLists.h"
-#include "project/ProjectMediaPaths.h"
 
 #include <algorithm>
+#include <cerrno>
 #include <cstdio>
 
-using platform::Error;
 using platform::URLRef;
 
 namespace {
 
-constexpr int kMissingDataCode = 1;
-constexpr std::size_t kLargestRecord = 1 << 20;
 /// A backup that is being deleted: hidden, so that one of which half is left is none any more.
 constexpr const char* kDeletedPrefix = ".deleted-";
-
-std::string lastComponent(const std::string& path)
-{
-    return path.substr(path.rfind('/') + 1);
-}
+constexpr int kMostLeftovers = 100;
 
 /// Whether a new backup may have the name: nothing has it, or a folder in which nothing is.
 bool isFree(const std::string& path)
@@ -38,58 +25,67 @@ bool isFree(const std::string& path)
     return names && names->empty();
 }
 
+/// Hidden first, then removed.
 bool deleteBackup(const std::string& path)
 {
-    const std::string doomed = path.substr(0, path.rfind('/') + 1) + kDeletedPrefix + lastComponent(path);
-    platform::FileStatus status;
-    if (platform::systemCalls().linkStatus(doomed.c_str(), &status) && !platform::removeTree(doomed))
-        return false; // left by one that was killed
-    return platform::systemCalls().renameWithoutReplacing(path.c_str(), doomed.c_str()) == 0 &&
-           platform::removeTree(doomed);
+    const std::size_t name = path.rfind('/') + 1;
+    const std::string doomed = path.substr(0, name) + kDeletedPrefix + path.substr(name);
+    for (int number = 0; number < kMostLeftovers; ++number) {
+        const std::string hidden = number == 0 ? doomed : doomed + '-' + std::to_string(number);
+        platform::FileStatus status;
+        if (platform::systemCalls().linkStatus(hidden.c_str(), &status) && !platform::removeTree(hidden))
+            continue; // left by one that was killed, and somebody else's
+        return platform::systemCalls().renameWithoutReplacing(path.c_str(), hidden.c_str()) == 0 &&
+               platform::removeTree(hidden);
+    }
+    return false;
 }
 
-/// The record of an exchange in the alternative's folder. `isThere` tells one that is not understood from none.
-std::optional<ExchangeRecord> recordIn(const std::string& alternative, bool& isThere)
-{
-    platform::FileStatus status;
-    const std::string path = ExchangeRecord::pathIn(alternative);
-    isThere = platform::systemCalls().linkStatus(path.c_str(), &status);
-    if (!isThere)
-        return std::nullopt;
-    const auto bytes = platform::readSmallFile(path.c_str(), kLargestRecord);
-    return bytes ? ExchangeRecord::fromBytes(*bytes) : std::nullopt;
-}
+/// What of an alternative's backups may be deleted, in the order of the list.
+class Purge {
+public:
+    Purge(const URLRef& bundleURL, long variantIndex)
+        : backups_(ProjectInformation::backupsForBundleURL(bundleURL, variantIndex)),
+          interrupted_(ProjectInformation::interruptedExchangeForBundleURL(bundleURL, variantIndex))
+    {
+    }
 
-std::string backupsFolder(const std::string& alternative)
-{
-    return alternative + '/' + ProjectLayout::backups;
-}
+    const std::vector<ProjectBackup>& backups() const { return backups_; }
+    /// One that takes part in an exchange that was cut short holds data of the alternative; when nobody knows which one
+    /// that is, it may be any.
+    bool isTaken(const std::string& path) const
+    {
+        return interrupted_ && (!interrupted_->backupURL || isSameItem(path, pathOf(interrupted_->backupURL)) ||
+                                path == pathOf(interrupted_->backupURL));
+    }
+    /// The first that may go, as many as there are too many. `kept` is not among them.
+    std::vector<std::string> doomed(std::size_t count, const std::string& kept = "") const
+    {
+        std::vector<std::string> paths;
+        for (const ProjectBackup& backup : backups_)
+            if (const std::string& path = pathOf(backup.url);
+                paths.size() < count && !isTaken(path) && (kept.empty() || !isSameItem(path, kept)))
+                paths.push_back(path);
+        return paths;
+    }
+    /// The one that was changed last goes last: somebody's newest work was put there, by a backup or an exchange,
+    /// however old its data is.
+    void putLastChangedLast()
+    {
+        const auto changed = [](const ProjectBackup& backup) {
+            const auto date = platform::modificationDate(pathOf(backup.url));
+            return date ? date->secondsSince2001 : 0;
+        };
+        const auto last = std::max_element(backups_.begin(), backups_.end(),
+                                           [&](const auto& a, const auto& b) { return changed(a) < changed(b); });
+        if (last != backups_.end())
+            std::rotate(last, std::next(last), backups_.end());
+    }
 
-/// What a record calls a backup's folder.
-std::string nameInRecord(const std::string& alternative, const std::string& backup)
-{
-    const std::string name = lastComponent(backup);
-    return backup == standardizedPath(backupsFolder(alternative)) + '/' + name ? name : backup;
-}
-
-std::string pathFromRecord(const std::string& alternative, const std::string& name)
-{
-    return name.starts_with('/') ? name : backupsFolder(alternative) + '/' + name;
-}
-
-/// Completes the exchange that was cut short when it was with the backup that is meant now, else undoes it. A path from
-/// a record is not followed: a package could name any folder.
-bool settleInterrupted(const ExchangeRecord& record, const std::string& alternative, bool isSame, Error* error)
-{
-    if (!isSame && record.backup.starts_with('/'))
-        return platform::fail(error, platform::ErrorDomain::status, kStatusFileBusy,
-                              "an exchange with \"" + record.backup +
-                                  "\" was cut short; an exchange with it completes that one");
-    platform::logLine(alternative + ": an exchange with backup \"" + record.backup + "\" was cut short; " +
-                      (isSame ? "completing it" : "undoing it"));
-    ProjectExchange exchange(alternative, pathFromRecord(alternative, record.backup));
-    return isSame ? exchange.complete(record, error) : exchange.undo(record, error);
-}
+private:
+    std::vector<ProjectBackup> backups_;
+    std::optional<InterruptedProjectExchange> interrupted_;
+};
 
 } // namespace
 
@@ -105,7 +101,9 @@ std::vector<ProjectBackup> ProjectInformation::backupsForBundleURL(const URLRef&
             continue;
         const URLRef url = itemIn(base, name.c_str(), true); // null for a name that is no text
         const std::string& path = pathOf(url);
-        if (!folderExists(path))
+        platform::FileStatus status; // a link to a folder is none: what it leads to is somebody else's
+        if (path.empty() || !platform::systemCalls().linkStatus(path.c_str(), &status) ||
+            status.kind != platform::FileKind::directory)
             continue;
         if (const auto date = platform::modificationDate(path + '/' + ProjectLayout::projectData))
             backups.push_back({url, *date});
@@ -121,76 +119,43 @@ URLRef ProjectInformation::urlForNewBackupForBundleURL(const URLRef& bundleURL, 
                                                        PurgeOldBackups purgeOldBackups)
 {
     const URLRef base = backupsBaseURLForBundleURL(bundleURL, variantIndex, CreateDirectories::no);
-    if (pathOf(base).empty() || maxBackups <= 0)
+    if (pathOf(base).empty() || maxBackups <= 0 || hasLinkBelow(pathOf(bundleURL), pathOf(base)))
         return nullptr;
-    std::vector<ProjectBackup> backups = backupsForBundleURL(bundleURL, variantIndex);
-    // One that takes part in an exchange that was cut short holds data of the alternative.
-    const auto interrupted = interruptedExchangeForBundleURL(bundleURL, variantIndex);
-    const std::string taken = interrupted ? pathOf(interrupted->backupURL) : "";
-
+    const Purge purge(bundleURL, variantIndex);
     const auto most = static_cast<std::size_t>(maxBackups);
-    std::size_t count = backups.size();
-    if (purgeOldBackups == PurgeOldBackups::yes) {
-        for (const ProjectBackup& backup : backups) {
-            if (count < most)
-                break;
-            if (pathOf(backup.url) == taken)
-                continue;
-            if (!deleteBackup(pathOf(backup.url)))
-                return nullptr;
-            --count;
-        }
-    }
-    if (count >= most)
+    const std::size_t there = purge.backups().size();
+    const std::size_t tooMany = there < most ? 0 : there - most + 1;
+    if (tooMany > 0 && purgeOldBackups == PurgeOldBackups::no)
         return nullptr;
+    const std::vector<std::string> doomed = purge.doomed(tooMany);
+    if (doomed.size() < tooMany)
+        return nullptr;
+    // The name comes first: without one nothing is deleted.
     for (std::size_t tried = 0; tried < most; ++tried) {
         char name[16];
-        std::snprintf(name, sizeof name, "%02u", static_cast<unsigned>((count + tried) % most)); // round to 00 and up
-        const URLRef url = itemIn(base, name, true);
-        if (pathOf(url) != taken && isFree(pathOf(url)))
-            return folderIn(base, name, create);
+        const std::size_t number = (there - tooMany + tried) % most; // round to 00 and up
+        std::snprintf(name, sizeof name, "%02u", static_cast<unsigned>(number));
+        const std::string path = pathOf(itemIn(base, name, true));
+        const bool isDoomed = std::find(doomed.begin(), doomed.end(), path) != doomed.end();
+        if (!isDoomed && (purge.isTaken(path) || !isFree(path)))
+            continue;
+        return std::all_of(doomed.begin(), doomed.end(), deleteBackup) ? folderIn(base, name, create) : nullptr;
     }
     return nullptr;
 }
 
-std::optional<InterruptedProjectExchange> ProjectInformation::interruptedExchangeForBundleURL(const URLRef& bundleURL,
-                                                                                              long variantIndex)
+bool ProjectInformation::purgeBackupsForBundleURL(const URLRef& bundleURL, long variantIndex, int maxBackups,
+                                                  const URLRef& kept)
 {
-    const auto alternative = pathForVariant(variantIndex, bundleURL, AcceptMissing::no);
-    bool isThere = false;
-    const auto record = alternative ? recordIn(*alternative, isThere) : std::nullopt;
-    if (!record)
-        return std::nullopt;
-    const std::string backup = pathFromRecord(*alternative, record->backup);
-    return InterruptedProjectExchange{
-        platform::URL::createWithFileSystemPath(platform::String::fromUTF8(backup), platform::PathStyle::posix, true),
-        ProjectExchange(*alternative, backup).isComplete(*record)};
-}
-
-bool ProjectInformation::exchangeDataOfProjectAtURL(const URLRef& bundleURL, long variantIndex, const URLRef& backupURL,
-                                                    Error* error)
-{
-    const auto alternative = pathForVariant(variantIndex, bundleURL, AcceptMissing::no);
-    if (!alternative)
-        return platform::fail(error, platform::ErrorDomain::status, kStatusFileNotFound,
-                              "there is no alternative " + std::to_string(variantIndex));
-    const std::string backup = pathOf(backupURL).empty() ? "" : standardizedPath(pathOf(backupURL));
-    const std::string name = nameInRecord(*alternative, backup);
-
-    bool isThere = false;
-    if (const auto record = recordIn(*alternative, isThere)) {
-        const bool isSame = record->backup == name;
-        if (!settleInterrupted(*record, *alternative, isSame, error))
-            return false;
-        if (isSame)
-            return true;
-    } else if (isThere) {
-        return platform::fail(error, platform::ErrorDomain::status, kStatusFileBusy,
-                              ExchangeRecord::pathIn(*alternative) + " cannot be read; it tells of an exchange that " +
-                                  "was cut short");
+    const URLRef base = backupsBaseURLForBundleURL(bundleURL, variantIndex, CreateDirectories::no);
+    if (pathOf(base).empty() || maxBackups <= 0 || hasLinkBelow(pathOf(bundleURL), pathOf(base))) {
+        errno = pathOf(base).empty() || maxBackups <= 0 ? EINVAL : ELOOP;
+        return false;
     }
-    if (backup.empty() || !itemExists(backup + '/' + ProjectLayout::projectData))
-        return platform::fail(error, kProjectErrorDomain, kMissingDataCode,
-                              "This backup is missing data and cannot not be restored."); // Kept: the wording
-    return ProjectExchange(*alternative, backup).run(name, error);
+    Purge purge(bundleURL, variantIndex);
+    purge.putLastChangedLast();
+    const auto most = static_cast<std::size_t>(maxBackups);
+    const std::size_t there = purge.backups().size();
+    const std::vector<std::string> doomed = purge.doomed(there > most ? there - most : 0, pathOf(kept));
+    return std::all_of(doomed.begin(), doomed.end(), deleteBackup);
 }

@@ -74,16 +74,18 @@ Dictionary ProjectInformation::convertNamesFromTokenBased(const Dictionary& name
     return name ? replacingInNames(names, kProjectNameToken, *name) : names;
 }
 
-std::optional<Dictionary> ProjectInformation::infoDictionaryWithContentsOfURL(const URLRef& url)
+std::optional<Dictionary> ProjectInformation::infoDictionaryWithContentsOfURL(const URLRef& url,
+                                                                              platform::PropertyListReading reading)
 {
     const auto bytes = platform::readSmallFile(pathOf(url).c_str(), kLargestProjectList);
-    return bytes ? dictionaryFromBytes(*bytes) : std::nullopt;
+    return bytes ? dictionaryFromBytes(*bytes, reading) : std::nullopt;
 }
 
-std::optional<Dictionary> ProjectInformation::infoDictionaryFromProjectBundleURL(const URLRef& bundleURL)
+std::optional<Dictionary> ProjectInformation::infoDictionaryFromProjectBundleURL(const URLRef& bundleURL,
+                                                                                 platform::PropertyListReading reading)
 {
     std::optional<Dictionary> info =
-        infoDictionaryWithContentsOfURL(projectInformationURLForBundleURL(bundleURL, CreateDirectories::no));
+        infoDictionaryWithContentsOfURL(projectInformationURLForBundleURL(bundleURL, CreateDirectories::no), reading);
     if (!info)
         return std::nullopt;
     const std::int64_t version = integerOf(valueFor(*info, ProjectInfoKey::bundleVersion)).value_or(0);

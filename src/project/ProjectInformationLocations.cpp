@@ -3,6 +3,7 @@
 #include "platform/SystemCalls.h"
 #include "project/ProjectLayout.h"
 
+#include <algorithm>
 #include <cerrno>
 #include <cstdio>
 #include <limits>
@@ -42,6 +43,27 @@ bool folderExists(const std::string& path)
     FileStatus status;
     return !path.empty() && platform::systemCalls().pathStatus(path.c_str(), &status) &&
            status.kind == FileKind::directory;
+}
+
+bool isSameItem(const std::string& a, const std::string& b)
+{
+    const platform::SystemCalls& calls = platform::systemCalls();
+    FileStatus first, second;
+    return !a.empty() && !b.empty() && calls.pathStatus(a.c_str(), &first) && calls.pathStatus(b.c_str(), &second) &&
+           first.device == second.device && first.inode == second.inode;
+}
+
+bool hasLinkBelow(const std::string& folder, const std::string& path)
+{
+    std::size_t end = folder.size();
+    while (end < path.size()) {
+        end = std::min(path.find('/', end + 1), path.size());
+        FileStatus status;
+        if (platform::systemCalls().linkStatus(path.substr(0, end).c_str(), &status) &&
+            status.kind == FileKind::symbolicLink)
+            return true;
+    }
+    return false;
 }
 
 namespace {

@@ -34,3 +34,7 @@ const std::string& pathOf(const platform::URLRef& url);
 /// Whether anything is there, links followed.
 bool itemExists(const std::string& path);
 bool folderExists(const std::string& path);
+/// Whether both paths lead to one item, whatever links they take.
+bool isSameItem(const std::string& a, const std::string& b);
+/// Whether one of the names by which `path` goes on behind `folder` is a symbolic link.
+bool hasLinkBelow(const std::string& folder, const std::string& path);

@@ -1,10 +1,8 @@
 #include "project/ProjectLists.h"
 
-#include "platform/PropertyList.h"
-
-std::optional<platform::Dictionary> dictionaryFromBytes(BytesView bytes)
+std::optional<platform::Dictionary> dictionaryFromBytes(BytesView bytes, platform::PropertyListReading reading)
 {
-    auto value = platform::readPropertyList(bytes);
+    auto value = platform::readPropertyList(bytes, nullptr, reading);
     auto* dictionary = value ? value->get<platform::Dictionary>() : nullptr;
     return dictionary != nullptr ? std::optional(std::move(*dictionary)) : std::nullopt;
 }

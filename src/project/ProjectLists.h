@@ -1,6 +1,7 @@
 // The property lists of a package as bytes and files.
 #pragma once
 
+#include "platform/PropertyList.h"
 #include "platform/core/Bytes.h"
 #include "platform/core/Value.h"
 
@@ -11,4 +12,5 @@
 inline constexpr std::size_t kLargestProjectList = std::size_t{512} << 20;
 
 /// Null for what is no property list of a dictionary.
-std::optional<platform::Dictionary> dictionaryFromBytes(BytesView bytes);
+std::optional<platform::Dictionary>
+dictionaryFromBytes(BytesView bytes, platform::PropertyListReading reading = platform::PropertyListReading::lenient);

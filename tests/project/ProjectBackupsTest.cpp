@@ -87,6 +87,55 @@ TEST(ProjectBackups, NewNames)
     }
 }
 
+TEST(ProjectBackups, WithoutANameNothingIsDeleted)
+{
+    const Backups backups({"05"});
+    backups.package().write(Backups::item("00") + "/MetaData.plist", std::string_view("no backup"));
+    EXPECT_EQ(backups.next(1, PurgeOldBackups::yes), "none");
+    EXPECT_EQ(backups.names(), Names{"05"});
+}
+
+TEST(ProjectBackups, PurgingKeepsTheOneThatWasMadeAndTheOneChangedLast)
+{
+    const auto purge = [](const Backups& backups, int most, const char* kept) {
+        EXPECT_TRUE(Info::purgeBackupsForBundleURL(backups.package().url(), 0, most, urlOf(backups.path(kept))));
+        return backups.names();
+    };
+    // By data the oldest first: an exchange put old data into 01 just now.
+    const Names there{"00", "01", "02", "03"};
+    for (const auto& [most, left] : {std::pair(4, there), std::pair(3, Names{"00", "01", "03"}),
+                                     std::pair(2, Names{"00", "01"}), std::pair(1, Names{"00"})}) {
+        const Backups backups(there);
+        for (const std::string& name : there)
+            fs::last_write_time(backups.path(name),
+                                fs::file_time_type::clock::now() + std::chrono::hours(name == "01" ? 0 : -1));
+        EXPECT_EQ(purge(backups, most, "00"), left) << most;
+    }
+}
+
+TEST(ProjectBackups, NothingBehindALinkIsTouched)
+{
+    for (const char* linked : {"Project File Backups", "Project File Backups/00"}) {
+        const Backups backups({"00", "01"});
+        backups.package().write("Alternatives/000/ProjectData", std::string_view("mine"));
+        const fs::path place = backups.package() / (std::string("Alternatives/000/") + linked);
+        const fs::path elsewhere = backups.package().folder() / "elsewhere";
+        fs::rename(place, elsewhere);
+        fs::create_directory_symlink(elsewhere, place);
+        const auto count = [&] {
+            return std::distance(fs::recursive_directory_iterator(elsewhere), fs::recursive_directory_iterator());
+        };
+        const auto before = count();
+        const bool isAll = std::string_view(linked).ends_with("Backups");
+        EXPECT_EQ(backups.next(1, PurgeOldBackups::yes), "none"); // 00 is the link's name
+        EXPECT_EQ(Info::purgeBackupsForBundleURL(backups.package().url(), 0, 1), !isAll);
+        Error error;
+        EXPECT_FALSE(Info::exchangeDataOfProjectAtURL(backups.package().url(), 0, urlOf(backups.path("00")), &error));
+        EXPECT_NE(error.description.find("is a link"), std::string::npos) << error.description;
+        EXPECT_EQ(count(), before);
+    }
+}
+
 TEST(ProjectBackups, ADeletionCutShortLeavesNoHalfBackup)
 {
     const Backups backups({"00", "01"});
@@ -118,6 +167,33 @@ TEST(ProjectBackups, OneOfAnInterruptedExchangeIsNotPurged)
     EXPECT_TRUE(interrupted->isComplete);
     EXPECT_EQ(backups.next(2, PurgeOldBackups::yes), "01");
     EXPECT_EQ(backups.names(), Names{"00"});
+}
+
+TEST(ProjectBackups, NorOneWhoseExchangeWasSpeltThroughALinkOrCannotBeRead)
+{
+    const Backups backups({"00", "01"});
+    backups.package().write("Alternatives/000/ProjectData", std::string_view("mine"));
+    const std::string link = backups.package().folder() / "Link.fuguex";
+    fs::create_directory_symlink(backups.package().path(), link);
+    {
+        FaultInjector faults;
+        faults.fail(Call::removeFile, EACCES, 2, 100);
+        faults.fail(Call::renameWithoutReplacing, EACCES, 3, 100);
+        faults.fail(Call::exchangeNames, EACCES, 2, 100);
+        EXPECT_FALSE(
+            Info::exchangeDataOfProjectAtURL(backups.package().url(), 0, urlOf(link + '/' + Backups::item("00"))));
+    }
+    const auto interrupted = Info::interruptedExchangeForBundleURL(backups.package().url(), 0);
+    ASSERT_TRUE(interrupted);
+    EXPECT_EQ(interrupted->backupURL->posixPath(), backups.path("00")); // by its name, however it was spelt
+    EXPECT_TRUE(Info::purgeBackupsForBundleURL(backups.package().url(), 0, 1));
+    EXPECT_TRUE(fs::exists(backups.path("00") + "/ProjectData"));
+    backups.package().write("Alternatives/000/.exchange.dummy", std::string_view("nonsense"));
+    ASSERT_TRUE(Info::interruptedExchangeForBundleURL(backups.package().url(), 0));
+    EXPECT_FALSE(Info::interruptedExchangeForBundleURL(backups.package().url(), 0)->backupURL);
+    EXPECT_EQ(backups.next(1, PurgeOldBackups::yes), "none");
+    EXPECT_TRUE(Info::purgeBackupsForBundleURL(backups.package().url(), 0, 1));
+    EXPECT_TRUE(fs::exists(backups.path("00") + "/ProjectData"));
 }
 
 } // namespace

@@ -112,6 +112,7 @@ protected:
         Error told;
         const bool done = exchange.exchange(kFirst, &told);
         EXPECT_EQ(told.domain, done ? "" : ErrorDomain::system);
+        EXPECT_EQ(told.code, done ? 0 : error) << told.description;
         wasLast = nth > faults.calls(call);
         return done;
     }
@@ -242,6 +243,85 @@ TEST(ProjectExchange, RecordsFromElsewhereMoveNothing)
         fs::remove(exchange.package() / record); // forgotten already, or not understood
         EXPECT_EQ(exchange.now(), exchange.before());
     }
+}
+
+TEST(ProjectExchange, ThreeRenamingsWhereNamesCannotBeExchanged)
+{
+    for (const int error : {EINVAL, ENOSYS, ENOTSUP, EACCES}) {
+        const Exchange exchange;
+        FaultInjector faults;
+        faults.fail(Call::exchangeNames, error, 1, 1 << 20);
+        EXPECT_EQ(exchange.exchange(), error != EACCES);
+        EXPECT_EQ(exchange.now(), error != EACCES ? exchange.after() : exchange.before());
+    }
+}
+
+/// One with the first backup that came to its end, or to its middle, and whose record is left.
+class CutShort : public Exchange {
+public:
+    explicit CutShort(bool isComplete, const std::string& backup = kFirst)
+    {
+        FaultInjector faults;
+        faults.fail(Call::removeFile, EACCES, 2, 1 << 20);
+        faults.fail(Call::exchangeNames, EACCES, isComplete ? 4 : 2, 1 << 20);
+        faults.fail(Call::renameWithoutReplacing, EACCES, isComplete ? 4 : 2, 1 << 20);
+        EXPECT_FALSE(Info::exchangeDataOfProjectAtURL(package().url(), 0,
+                                                      urlOf(backup.starts_with('/') ? backup : package() / backup)));
+        EXPECT_TRUE(interrupted());
+    }
+    bool settle(SettleExchange how, const std::string& backup = "", Error* error = nullptr) const
+    {
+        return Info::settleInterruptedExchangeForBundleURL(package().url(), 0, how,
+                                                           backup.empty() ? nullptr : urlOf(backup), error);
+    }
+};
+
+TEST(ProjectExchange, ACompleteOneIsNotUndoneLater)
+{
+    const QuietLog quiet;
+    const CutShort exchange(true);
+    ASSERT_TRUE(exchange.interrupted()->isComplete);
+    EXPECT_TRUE(exchange.exchange(kSecond));
+    EXPECT_TRUE(exchange.exchange(kSecond));
+    EXPECT_EQ(exchange.now(), exchange.after());
+}
+
+TEST(ProjectExchange, OneThatWasCutShortIsSettledByItself)
+{
+    const QuietLog quiet;
+    for (const SettleExchange how : {SettleExchange::complete, SettleExchange::undo, SettleExchange::forget}) {
+        const CutShort exchange(false);
+        const Tree middle = exchange.now();
+        EXPECT_TRUE(exchange.settle(how));
+        EXPECT_FALSE(exchange.interrupted());
+        exchange.expectAllThere();
+        if (how != SettleExchange::forget)
+            EXPECT_EQ(exchange.now(), how == SettleExchange::complete ? exchange.after() : exchange.before());
+        else
+            EXPECT_EQ(exchange.now().size() + 1, middle.size()); // the record alone
+        EXPECT_FALSE(exchange.settle(how));
+    }
+    const CutShort exchange(false);
+    exchange.package().write(std::string(kAlternative) + "/.exchange.dummy", std::string_view("nonsense"));
+    EXPECT_FALSE(exchange.exchange());
+    EXPECT_FALSE(exchange.settle(SettleExchange::complete));
+    EXPECT_TRUE(exchange.settle(SettleExchange::forget));
+}
+
+TEST(ProjectExchange, APathInARecordIsFollowedWhenItIsNamed)
+{
+    const QuietLog quiet;
+    const TemporaryFolder other;
+    fs::create_directory(other / "backup");
+    other.write("backup/ProjectData", "elsewhere");
+    fs::create_directory_symlink(other.path(), other / "link");
+    const CutShort exchange(false, other / "backup");
+    EXPECT_FALSE(exchange.settle(SettleExchange::complete));
+    EXPECT_FALSE(exchange.settle(SettleExchange::complete, exchange.package() / kFirst));
+    EXPECT_FALSE(exchange.exchange(kFirst));
+    EXPECT_TRUE(exchange.settle(SettleExchange::undo, other / "link/backup")); // the same folder
+    EXPECT_EQ(exchange.now(), exchange.before());
+    EXPECT_EQ(textOf(readFile(other / "backup/ProjectData")), "elsewhere");
 }
 
 TEST(ProjectExchange, WhatStandsAsideIsNotTouched)

@@ -188,14 +188,35 @@ TEST(ProjectInformation, MetaDataFallsBackToItsCopyAndIsKept)
     const auto project = package.open();
     ASSERT_TRUE(project);
     EXPECT_EQ(project->sampleRate(0), 44100U);
-    EXPECT_EQ(project->loadMetaDataForVariant(1), nullptr); // readable, but no property list
+    EXPECT_EQ(project->sampleRate(1), 44100U); // readable, but no property list
+    EXPECT_EQ(project->loadMetaDataForVariant(2), nullptr);
     EXPECT_EQ(project->loadMetaDataForVariant(-1), nullptr);
     EXPECT_EQ(project->loadMetaDataForVariant(99999999999), nullptr);
     // What was read stays; what failed is tried again.
     fs::remove(package / "Alternatives/000/MetaData.bak");
-    package.writeMetaData({{"SampleRate", 96000}}, "Alternatives/001");
+    package.writeMetaData({{"SampleRate", 96000}}, "Alternatives/002");
     EXPECT_EQ(project->sampleRate(0), 44100U);
-    EXPECT_EQ(project->sampleRate(1), 96000U);
+    EXPECT_EQ(project->sampleRate(2), 96000U);
+}
+
+TEST(ProjectInformation, OneValueThatCannotBeReadCostsNoOther)
+{
+    const PackageOnDisk package;
+    const std::string odd = "<key>Own</key><integer>18446744073709551615</integer><key>Empty</key><real/>"
+                            "<key>Day</key><date>2026-11-21T12:30:00.5+01:00</date>";
+    const auto list = [&](const std::string& more) { return "<plist><dict>" + odd + more + "</dict></plist>"; };
+    package.write("Resources/ProjectInformation.plist",
+                  list("<key>VariantNames</key><dict><key>0</key><string>a</string></dict>"));
+    package.write("Alternatives/000/MetaData.plist",
+                  list("<key>SampleRate</key><integer>96000</integer><key>AudioFiles</key><array><string>a</string>"
+                       "<real/><string>b</string></array>"));
+    const auto project = package.open();
+    ASSERT_TRUE(project);
+    EXPECT_EQ(project->variationNameForIndex(0), "a");
+    EXPECT_EQ(project->sampleRate(0), 96000U);
+    EXPECT_EQ(project->filesUsedByAnyVariant(ProjectMediaKind::audio).size(), 2U);
+    // Who is going to write it back must not lose what it cannot hold.
+    EXPECT_FALSE(Info::infoDictionaryFromProjectBundleURL(package.url()));
 }
 
 TEST(ProjectInformation, ValuesOfTheWrongShapeReadAsAbsent)

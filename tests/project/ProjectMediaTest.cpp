@@ -1,6 +1,8 @@
 #include "PackageOnDisk.h"
 #include "project/ProjectMediaPaths.h"
 
+#include <set>
+
 namespace {
 
 using namespace platform;
@@ -46,6 +48,29 @@ TEST(ProjectMedia, MovedPackageAndProjectFolder)
     package.moveTo("Tune.fuguex");
     const ProjectFileSet files = package.open()->allUsedFilesByAnyVariant();
     EXPECT_EQ(files, (ProjectFileSet{package / "Media/9", package.folder() / "Audio Files/a.wav"}));
+}
+
+TEST(ProjectFileSet, HoldsWhatAStandardSetHolds)
+{
+    ProjectFileSet files;
+    std::set<std::string> expected;
+    std::string large(300'000, 'x'); // more than a block of texts
+    for (int i = 0; i < 5000; ++i) {
+        const std::string path = "/media/" + std::to_string(i * 7919 % 3000);
+        EXPECT_EQ(files.insert(path), expected.insert(path).second) << path;
+    }
+    EXPECT_FALSE(files.contains("/media/3000"));
+    EXPECT_FALSE(files.contains("/media/"));
+    EXPECT_FALSE(files.contains(large));
+    EXPECT_TRUE(files.insert(large) && files.contains(large));
+    expected.insert(large);
+    EXPECT_EQ(files.size(), expected.size());
+    EXPECT_EQ(std::set<std::string>(files.begin(), files.end()), expected);
+    for (const std::string& path : expected)
+        EXPECT_TRUE(files.contains(path));
+    EXPECT_FALSE(ProjectFileSet().contains(""));
+    EXPECT_FALSE((ProjectFileSet{"/a", "/b"} == ProjectFileSet{"/a", "/c"}));
+    EXPECT_FALSE((ProjectFileSet{"/a"} == ProjectFileSet{"/a", "/c"}));
 }
 
 } // namespace

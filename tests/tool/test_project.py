@@ -2,6 +2,7 @@
 import json
 import os
 import plistlib
+import shutil
 import subprocess
 import threading
 import time
@@ -149,6 +150,122 @@ class Edits(ProjectTest):
         self.assertIn("was cut short; completed it", self.lines("project", "restore", "Song.fuguex", "00")[0])
         self.assertEqual((self.read(ALTERNATIVE + "ProjectData"), self.read(BACKUPS + "00/ProjectData")),
                          (b"old", b"data"))
+
+    def cut_short(self, backup="00", name=None):
+        """As if an exchange had been killed behind its first step."""
+        self.put(BACKUPS + backup + "/ProjectData", b"old")
+        places = ("Autosave", "ProjectData", "ARA Files", "MetaData.plist", "MetaData.bak")
+        inode = lambda path: path.stat().st_ino if path.exists() else 0
+        items = [[inode(self.package / folder / item) for folder in (ALTERNATIVE, BACKUPS + backup)] for item in places]
+        self.put(ALTERNATIVE + ".exchange.dummy", plistlib.dumps({"Backup": name or backup, "Items": items}))
+        data, old = self.package / ALTERNATIVE / "ProjectData", self.package / BACKUPS / backup / "ProjectData"
+        os.rename(data, self.folder / "aside")
+        os.rename(old, data)
+        os.rename(self.folder / "aside", old)
+
+    def test_settle(self):
+        self.failure("project", "settle", "Song.fuguex")
+        before = {path: content for path, content in self.tree().items()}
+        record = self.package / ALTERNATIVE / ".exchange.dummy"
+        for options, data, ara in (([], b"old", False), (["--undo"], b"data", True), (["--forget"], b"old", True)):
+            self.cut_short()
+            self.run_command("project", "settle", "--dry-run", *options, "Song.fuguex")
+            self.assertTrue(record.exists())
+            told = self.json("project", "settle", *options, "Song.fuguex")
+            self.assertEqual(told["backup"], "00")
+            self.assertFalse(record.exists())
+            self.assertEqual(self.read(ALTERNATIVE + "ProjectData"), data)
+            self.assertEqual((self.package / ALTERNATIVE / "ARA Files").exists(), ara)
+            shutil.rmtree(self.package / BACKUPS)
+            for path, content in before.items():
+                self.put(path, content)
+        elsewhere = str(self.package / BACKUPS / "00" / ".." / "00")  # a path, which a stranger may have written
+        self.cut_short(name=elsewhere)
+        self.assertIn("--with", self.failure("project", "settle", "Song.fuguex"))
+        self.failure("project", "settle", "--with", ".", "Song.fuguex")
+        self.run_command("project", "settle", "--undo", "--with", "Song.fuguex/" + BACKUPS + "00", "Song.fuguex")
+        self.assertEqual(self.read(ALTERNATIVE + "ProjectData"), b"data")
+        record.write_bytes(b"nonsense")
+        self.assertIsNone(self.json("project", "Song.fuguex")["alternatives"][1]["interruptedExchange"])
+        for command in (["backup"], ["settle"], ["settle", "--undo"]):
+            self.failure("project", *command, "Song.fuguex")
+        self.assertIn("--forget", self.failure("project", "restore", "Song.fuguex", "00"))
+        self.run_command("project", "settle", "--forget", "Song.fuguex")
+        self.run_command("project", "backup", "Song.fuguex")
+
+    def test_the_last_good_backup_stays(self):
+        self.put(BACKUPS + "05/ProjectData", b"good")
+        self.put(BACKUPS + "00/MetaData.plist", b"no backup")
+        self.assertEqual(self.lines("project", "backup", "--keep", "2", "Song.fuguex"),
+                         ["Song.fuguex: copied alternative 1 to backup 01"])
+        self.assertEqual(self.read(BACKUPS + "05/ProjectData"), b"good")
+        os.utime(self.package / ALTERNATIVE / "ProjectData", (1, 1))  # old data, newly backed up
+        self.run_command("project", "backup", "--keep", "1", "Song.fuguex")
+        self.assertEqual(sorted(os.listdir(self.package / BACKUPS)), ["00", "02"])
+        self.assertEqual(self.read(BACKUPS + "02/ProjectData"), b"data")
+
+    def test_a_backup_holds_what_links_lead_to(self):
+        os.rename(self.package / ALTERNATIVE / "ProjectData", self.folder / "data")
+        (self.package / ALTERNATIVE / "ProjectData").symlink_to(self.folder / "data")
+        closed = self.package / ALTERNATIVE / "ARA Files/deep"
+        closed.chmod(0o555)
+        os.mkdir(self.package / BACKUPS, 0o777)
+        left = self.package / BACKUPS / ".ktfiles-backup-1-00000000"  # by a process that was killed
+        left.mkdir()
+        for path in (self.package, self.folder, *self.package.rglob("*"), self.folder / "data"):
+            if os.geteuid() == 0:
+                os.chown(path, 54321, 54321, follow_symlinks=False)
+
+        def become_user():  # root may write into any folder
+            os.setgid(54321)
+            os.setuid(54321)
+        user = {"preexec_fn": become_user} if os.geteuid() == 0 else {}
+        user["env"] = {**os.environ, "KTFILES_COORDINATION": str(self.folder / "coordination")}
+        for number in range(2):
+            self.run_command("project", "backup", "--keep", "1", "Song.fuguex", **user)
+        self.assertEqual(os.listdir(self.package / BACKUPS), ["01"])
+        data = self.package / BACKUPS / "01/ProjectData"
+        self.assertEqual((data.is_symlink(), data.read_bytes()), (False, b"data"))
+        copied = self.package / BACKUPS / "01/ARA Files/deep"
+        self.assertEqual((copied.stat().st_mode & 0o777, (copied / "file").read_bytes()), (0o555, b"ara"))
+        closed.chmod(0o755)
+        (closed / "around").symlink_to("..")
+        self.assertIn("around is a link", self.failure("project", "backup", "Song.fuguex", **user))
+        self.assertEqual(os.listdir(self.package / BACKUPS), ["01"])
+        shutil.rmtree(self.folder / "coordination")
+
+    def test_nothing_goes_through_a_strangers_link(self):
+        victim = self.folder / "victim"
+        (victim / "00").mkdir(parents=True)
+        (victim / "00/ProjectData").write_bytes(b"precious")
+        for place, target in ((BACKUPS.rstrip("/"), victim), (BACKUPS + "00", victim / "00")):
+            link = self.package / place
+            link.parent.mkdir(exist_ok=True)
+            link.symlink_to(target)
+            self.assertIn("is a link", self.failure("project", "restore", "Song.fuguex", "00"))
+            if target == victim:
+                self.assertIn("is a link", self.failure("project", "backup", "--keep", "1", "Song.fuguex"))
+            else:
+                self.run_command("project", "backup", "--keep", "1", "Song.fuguex")
+            self.assertEqual({str(path.relative_to(victim)) for path in victim.rglob("*")}, {"00", "00/ProjectData"})
+            link.unlink()
+
+    def test_a_link_leads_to_one_package_for_all_that_is_done(self):
+        inner = self.folder / "elsewhere/inner"
+        inner.mkdir(parents=True)
+        os.rename(self.package, self.folder / "elsewhere/Song.fuguex")
+        (self.folder / "link").symlink_to(inner)
+        (self.folder / "Song.fuguex").mkdir()  # what "link/.." is by its text
+        self.run_command("project", "backup", "link/../Song.fuguex")
+        self.package = self.folder / "elsewhere/Song.fuguex"
+        self.assertEqual(self.read(BACKUPS + "00/ProjectData"), b"data")
+        self.assertEqual(os.listdir(self.folder / "Song.fuguex"), [])
+        (self.folder / "Alias.fuguex").symlink_to(self.package)
+        info = plistlib.loads(self.read("Resources/ProjectInformation.plist"))
+        self.put("Resources/ProjectInformation.plist", plistlib.dumps({**info, "HasProjectFolder": True}))
+        for name in ("Alias.fuguex", "elsewhere/Song.fuguex"):
+            self.assertIn(f"audio\tmissing\t{self.folder}/elsewhere/there.wav",
+                          self.lines("project", "media", name))
 
     def test_edits_wait_for_each_other(self):
         runs = [threading.Thread(target=self.run_command, args=("project", "backup", "Song.fuguex")) for _ in range(6)]

@@ -9,6 +9,7 @@
 #include <string_view>
 
 #include <dirent.h>
+#include <fcntl.h>
 #include <sys/stat.h>
 
 namespace platform {
@@ -107,6 +108,8 @@ bool removeTree(const std::string& path)
             errno = EXDEV;
             return false;
         }
+        if (const std::uint32_t all = status.permissions | S_IRWXU; all != status.permissions) // a read-only folder
+            ::fchmodat(AT_FDCWD, item.path.c_str(), all, AT_SYMLINK_NOFOLLOW);
         const auto names = namesInFolder(item.path);
         if (!names)
             return false;

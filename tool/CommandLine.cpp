@@ -1,6 +1,7 @@
 #include "CommandLine.h"
 
 #include "ChunkId.h"
+#include "CoordinationFolder.h"
 #include "Failure.h"
 #include "UnseenCharacters.h"
 
@@ -166,6 +167,7 @@ void CommandLine::addOutputOptions(CLI::App& verb)
     verb.add_option_function<std::string>("--color", setColor, "Color the output: auto, always or never")
         ->option_text("WHEN")
         ->check(CLI::Validator(colorProblem, ""));
+    addCoordinationFolder(verb);
 }
 
 CLI::Option* CommandLine::addFile(CLI::App& verb, std::string& file, const std::string& name)

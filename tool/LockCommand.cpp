@@ -5,6 +5,7 @@
 #include "Failure.h"
 #include "FileAccess.h"
 #include "Parties.h"
+#include "TimeoutOption.h"
 #include "coordination/KTFileCoordinationLock.h"
 #include "coordination/KTFilePresenterLock.h"
 #include "platform/Log.h"
@@ -25,8 +26,6 @@ namespace {
 
 using Clock = std::chrono::steady_clock;
 using Seconds = std::chrono::duration<double>;
-
-constexpr double kLongestTimeout = 1e8; // three years
 
 struct LockArguments {
     std::string file;
@@ -173,8 +172,10 @@ int lockAndRun(const LockArguments& arguments, const OutputOptions& options)
     const Descriptor shown(::open(arguments.file.c_str(), O_PATH | O_CLOEXEC));
     Holder holder(arguments, url);
     awaitLock(holder, arguments, url, options.quiet);
-    if (!arguments.command.empty())
+    if (!arguments.command.empty()) {
+        announceLock();
         return runChild(arguments.command);
+    }
     sayHeld(arguments, options);
     awaitEndOfInput();
     return kExitOK;
@@ -201,9 +202,7 @@ void declareLock(CommandLine& commandLine)
     verb.add_flag("--read", arguments.read, "Let others read, and hold writers back");
     verb.add_flag("--write", arguments.write, "Hold readers and writers back; so it is without an option");
     verb.add_flag("--presenter", arguments.presenter, "The same as a program that keeps the file open, and is asked");
-    verb.add_option("--timeout", arguments.timeout, "Give up after that long: exit status 1, nothing is run")
-        ->option_text("SECONDS")
-        ->check(CLI::Range(0.0, kLongestTimeout).description(""));
+    addTimeout(verb, arguments.timeout, "Give up after that long: exit status 1, nothing is run");
     verb.footer("Exit status: the command's, 128 + N when signal N ended it, 127 when there is no such command, 126\n"
                 "when it cannot be run; 1 when the lock was not had, and 2 for a mistake on the command line.");
 }

@@ -41,14 +41,31 @@ int parentOf(int processID)
                                                                                                              : 0;
 }
 
-/// Processes above this one that run this command. The only verb of it that runs others is `lock`.
+// "12:34:", the processes that wait for what runs in this environment.
+constexpr const char* kLocksVariable = "KTFILES_LOCKS";
+
+/// Whether a process runs the same file as this one, under whatever name.
+bool isSameProgram(int processID)
+{
+    struct stat own = {}, other = {};
+    return ::stat("/proc/self/exe", &own) == 0 && ::stat(fmt::format("/proc/{}/exe", processID).c_str(), &other) == 0 &&
+           own.st_dev == other.st_dev && own.st_ino == other.st_ino;
+}
+
+/// Processes above this one that run this command. The only verb of it that runs others is `lock`. It says so in the
+/// environment, which also holds for another copy or version of the command; where the environment was cleared on the
+/// way, the program's file tells it.
 const std::set<int>& locksAbove()
 {
     static const std::set<int> found = [] {
+        std::set<int> announced;
+        const char* const variable = std::getenv(kLocksVariable);
+        std::istringstream words(variable != nullptr ? variable : "");
+        for (std::string word; std::getline(words, word, ':');)
+            announced.insert(std::atoi(word.c_str()));
         std::set<int> processes;
-        const std::string name = processName(::getpid());
         for (int process = ::getppid(); process > 1; process = parentOf(process))
-            if (processName(process) == name)
+            if (announced.contains(process) || isSameProgram(process))
                 processes.insert(process);
         return processes;
     }();
@@ -156,6 +173,12 @@ std::string lockersText(int descriptor)
     const char* const verb = lockers.size() > 1 ? "have" : "has";
     return fmt::format("{}, which {} locked it{}", textOf(lockers), verb,
                        kind == FileLockKind::read ? " for reading" : "");
+}
+
+void announceLock()
+{
+    const char* const before = std::getenv(kLocksVariable);
+    ::setenv(kLocksVariable, fmt::format("{}{}:", before != nullptr ? before : "", ::getpid()).c_str(), 1);
 }
 
 std::optional<platform::CoordinationParty> lockAbove(const platform::CoordinatedItem& item)

@@ -18,6 +18,9 @@ std::string blockersText(const platform::CoordinatedItem& item, bool isWriting);
 /// it".
 std::string lockersText(int descriptor);
 
+/// Lets the commands that this process will run know that it waits for them, with what it locks.
+void announceLock();
+
 /// What a `ktfiles lock` that runs this process has of the item: it waits for us, so that nobody here must wait for it.
 /// Of a lock for reading and one for writing, the latter.
 std::optional<platform::CoordinationParty> lockAbove(const platform::CoordinatedItem& item);

@@ -5,10 +5,10 @@ _ktfiles()
     local cur prev words cword
     _init_completion || return
 
-    local common='--json --quiet --color --help' edit='--in-place --dry-run --backup'
+    local common='--json --quiet --color --coordination --help' edit='--in-place --dry-run --backup'
     local keys='beatCount midiRootNote keyType signatureTop signatureBottom loopFileType instrumentType
         instrumentSubType genre descriptors title artist copyright comments transients key mode signature'
-    local projects='media dirs backup restore rename-alternative'
+    local projects='media dirs backup restore settle rename-alternative'
     local verb=${words[1]} object=${words[2]}
 
     if [[ $verb == lock ]]; then
@@ -29,6 +29,7 @@ _ktfiles()
     esac
     case $prev in
         --color) COMPREPLY=($(compgen -W 'auto always never' -- "$cur")); return ;;
+        --coordination | --with) _filedir -d; return ;;
         --from | -o | --output | --png | --svg) _filedir; return ;;
         --sidecar) return ;;
         --colors) COMPREPLY=($(compgen -W 'night day amber rose ink' -- "$cur")); return ;;
@@ -62,10 +63,11 @@ _ktfiles()
             lock/*) COMPREPLY=($(compgen -W "--read --write --presenter --timeout -- $common" -- "$cur")) ;;
             scan/*) COMPREPLY=($(compgen -W "--csv --threads $common" -- "$cur")) ;;
             project/media) COMPREPLY=($(compgen -W "--missing --alternative $common" -- "$cur")) ;;
-            project/dirs) COMPREPLY=($(compgen -W "--create --alternative $common" -- "$cur")) ;;
-            project/backup) COMPREPLY=($(compgen -W "--keep --alternative --dry-run $common" -- "$cur")) ;;
-            project/restore) COMPREPLY=($(compgen -W "--alternative --dry-run $common" -- "$cur")) ;;
-            project/rename-alternative) COMPREPLY=($(compgen -W "$edit $common" -- "$cur")) ;;
+            project/dirs) COMPREPLY=($(compgen -W "--create --alternative --timeout $common" -- "$cur")) ;;
+            project/backup) COMPREPLY=($(compgen -W "--keep --alternative --dry-run --timeout $common" -- "$cur")) ;;
+            project/restore) COMPREPLY=($(compgen -W "--alternative --dry-run --timeout $common" -- "$cur")) ;;
+            project/settle) COMPREPLY=($(compgen -W "--undo --forget --with --alternative --dry-run --timeout $common" -- "$cur")) ;;
+            project/rename-alternative) COMPREPLY=($(compgen -W "--timeout $edit $common" -- "$cur")) ;;
             *) COMPREPLY=($(compgen -W "$common" -- "$cur")) ;;
         esac
     elif [[ $verb == chunks && $object == @(get|add|remove) ]] && ((cword == 4)) && [[ $prev != -* ]]; then

@@ -1,5 +1,6 @@
 // The command `ktfiles`. Each verb is a file of its own, and registers itself with the command line.
 #include "CommandLine.h"
+#include "CoordinationFolder.h"
 #include "platform/Log.h"
 
 #include <csignal>
@@ -23,5 +24,6 @@ int main(int argc, char** argv)
     occupyStandardDescriptors();
     std::signal(SIGXFSZ, SIG_IGN);    // a file size limit is an error like a full disk
     platform::setLogHandler(nullptr); // what went wrong is said in one line of our own
+    useCoordinationFolderOfEnvironment();
     return CommandLine().run(argc, argv);
 }

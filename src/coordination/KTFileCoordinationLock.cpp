@@ -97,17 +97,13 @@ void KTFileCoordinationLock::acquire()
 /// Access stays open until the last holder has left, which may be before the handlers have returned.
 void KTFileCoordinationLock::hold(std::unique_ptr<platform::CoordinatedAccess> access)
 {
-    std::vector<KTFileLockHandler> handlers;
     {
         const std::lock_guard guard(blockCreateLock_);
         newURL_ = access->url();
         access_ = std::move(access);
-        handlers = holders_.acquired();
+        holders_.acquired();
     }
-    for (const KTFileLockHandler& handler : handlers)
-        if (handler)
-            handler();
-    handlers.clear();
+    holders_.callHandlers(blockCreateLock_);
     {
         const std::lock_guard guard(blockCreateLock_);
         if (holders_.settle())

@@ -7,9 +7,9 @@
 #include <functional>
 #include <memory>
 
-/// Called once the lock is held: at once on the caller's thread when it was held already, else inside the coordinated
-/// access that took the lock, on its thread. It may retain and release; an access of its own to the same file would
-/// wait for itself.
+/// Called once the lock is held, in the order of the retains: at once on the caller's thread when the lock was held and
+/// nobody before is still to be called, else inside the coordinated access that took the lock, on its thread. It may
+/// retain and release; an access of its own to the same file would wait for itself.
 using KTFileLockHandler = std::function<void()>;
 
 struct KTFileLockOptions {

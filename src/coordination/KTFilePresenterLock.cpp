@@ -143,14 +143,11 @@ void KTFilePresenterLock::acquire()
                                               .coordinateAcquiring(
                                                   item_,
                                                   [this](const auto&) {
-                                                      std::vector<KTFileLockHandler> handlers;
                                                       {
                                                           const std::lock_guard guard(blockCreateLock_);
-                                                          handlers = holders_.acquired();
+                                                          holders_.acquired();
                                                       }
-                                                      for (const KTFileLockHandler& handler : handlers)
-                                                          if (handler)
-                                                              handler();
+                                                      holders_.callHandlers(blockCreateLock_);
                                                       const std::lock_guard guard(blockCreateLock_);
                                                       if (holders_.settle())
                                                           becomeIdle();

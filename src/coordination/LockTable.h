@@ -31,18 +31,9 @@ public:
     template <class Make, class Use>
     void findOrAddAndUse(const platform::CoordinatedItem& item, const Make& make, const Use& use)
     {
-        std::shared_ptr<Lock> lock;
-        {
-            const std::lock_guard guard(mutex_);
-            Entry* entry = entryFor(item, make);
-            if (entry == nullptr)
-                return;
-            ++entry->users;
-            lock = entry->lock;
-        }
-        use(*lock);
-        const std::lock_guard guard(mutex_);
-        --entries_.find(item.key())->second.users;
+        const User user(*this, item, make);
+        if (user.lock)
+            use(*user.lock);
     }
 
     /// Takes the file's lock out, unless it is in use: the lock that is registered no more, or null.
@@ -85,6 +76,32 @@ private:
         int users = 0;
 
         bool isUnused() const { return users == 0 && !lock->isInUse(); }
+    };
+
+    /// Counts as a user of the item's entry, also when what it does ends with an exception of the host's.
+    struct User {
+        LockTable& table;
+        const platform::SHA256Digest key;
+        std::shared_ptr<Lock> lock; // null when there is no entry
+
+        template <class Make>
+        User(LockTable& owner, const platform::CoordinatedItem& item, const Make& make) : table(owner),
+                                                                                          key(item.key())
+        {
+            const std::lock_guard guard(table.mutex_);
+            if (Entry* entry = table.entryFor(item, make)) {
+                ++entry->users;
+                lock = entry->lock;
+            }
+        }
+        ~User()
+        {
+            const std::lock_guard guard(table.mutex_);
+            if (lock)
+                --table.entries_.find(key)->second.users;
+        }
+        User(const User&) = delete;
+        User& operator=(const User&) = delete;
     };
 
     template <class Make>

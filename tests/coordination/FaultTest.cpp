@@ -229,6 +229,10 @@ TEST_F(FaultTest, AFolderThatIsNotOursAloneIsRefused)
         fs::create_directory(folder());
         fs::permissions(folder(), fs::perms::owner_all);
         ASSERT_EQ(chown(folder().c_str(), 65534, 65534), 0);
+        Error error;
+        FileCoordinator::setCoordinationFolder(folder());
+        EXPECT_FALSE(FileCoordinator().openForReading(itemURL(), FileCoordinator::ReadingOptions::none, &error));
+        EXPECT_NE(error.description.find("user 65534"), std::string::npos) << error.description;
         expectRefused("of another user", EACCES);
     }
     expectRefused("missing, and made", 0);

@@ -7,9 +7,12 @@
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <array>
 #include <atomic>
 #include <condition_variable>
+#include <filesystem>
+#include <future>
 #include <thread>
 
 using namespace platform;
@@ -114,6 +117,34 @@ TYPED_TEST(LockCountTest, AReleaseDuringTheAcquisitionTakesALaterHolderOrCancels
     }
 }
 
+TYPED_TEST(LockCountTest, WhoRetainsDuringTheFirstHandlerIsCalledBehindTheOthers)
+{
+    std::promise<void> begun, goOn;
+    {
+        const auto other = openForWriting(this->itemURL());
+        this->lock->retainLockWithFinishedHandler([&] {
+            begun.set_value();
+            goOn.get_future().wait();
+            this->calls.handler('a')();
+        });
+        this->lock->retainLockWithFinishedHandler(this->calls.handler('b'));
+    }
+    begun.get_future().wait();
+    this->lock->retainLockWithFinishedHandler(this->calls.handler('c'));
+    EXPECT_EQ(this->lock->lockCount(), 3);
+    EXPECT_EQ(this->calls.text(), "");
+    goOn.set_value();
+    EXPECT_EQ(this->calls.await(3), "abc");
+    this->lock->resetLock();
+    awaitFree(this->itemURL());
+    this->lock->retainLockWithFinishedHandler(this->calls.handler('d'));
+    this->calls.await(4);
+    // All were called, or nearly so: then one is called at once, on this thread.
+    for (auto caller = std::make_shared<std::atomic<std::thread::id>>(); *caller != std::this_thread::get_id();)
+        this->lock->retainLockWithFinishedHandler([caller] { *caller = std::this_thread::get_id(); });
+    this->lock->resetLock();
+}
+
 TYPED_TEST(LockCountTest, AnAcquisitionThatFailsCallsNobodyAndLeavesTheLockIdle)
 {
     FileCoordinator::setCoordinationFolder(this->item("no/such/folder"));
@@ -126,6 +157,53 @@ TYPED_TEST(LockCountTest, AnAcquisitionThatFailsCallsNobodyAndLeavesTheLockIdle)
     this->lock->retainLockWithFinishedHandler(this->calls.handler('b'));
     EXPECT_EQ(this->calls.await(1), "b");
     this->lock->releaseLock();
+}
+
+namespace {
+
+/// Descriptors of this process that are sockets: others find its presenters by one.
+std::ptrdiff_t sockets()
+{
+    std::error_code error;
+    const std::filesystem::directory_iterator all("/proc/self/fd");
+    return std::count_if(begin(all), end(all), [&](const auto& entry) {
+        return std::filesystem::read_symlink(entry.path(), error).string().starts_with("socket:");
+    });
+}
+
+template <class Lock>
+void retainByURL(const URLRef& url, KTFileLockHandler handler)
+{
+    if constexpr (std::is_same_v<Lock, KTFilePresenterLock>)
+        Lock::retainLockForURL(url, {}, std::move(handler));
+    else
+        Lock::retainWriteLockForURL(url, std::move(handler));
+}
+
+} // namespace
+
+TYPED_TEST(LockCountTest, TheTableKnowsALockUntilItIsRemoved)
+{
+    this->lock.reset(); // it is presented too
+    const std::ptrdiff_t before = sockets();
+    EXPECT_FALSE(TypeParam::lockForURL(this->itemURL()));
+    retainByURL<TypeParam>(this->itemURL(), this->calls.handler('a'));
+    this->calls.await(1);
+    const auto kept = TypeParam::lockForURL(this->itemURL());
+    ASSERT_TRUE(kept);
+    EXPECT_EQ(kept->lockCount(), 1);
+    const bool presents = std::is_same_v<TypeParam, KTFilePresenterLock>;
+    EXPECT_NE(TypeParam::_logLocks().find("\nLocked: YES Count:   1 " + std::string(presents ? "R: NO  W: NO  " : "") +
+                                          "Path: '" + this->item() + "'"),
+              std::string::npos);
+    // What a host's handler throws comes back to the host, and costs the table nothing.
+    EXPECT_THROW(retainByURL<TypeParam>(this->itemURL(), [] { throw 1; }), int);
+    EXPECT_EQ(kept->lockCount(), 2);
+    kept->resetLock();
+    awaitFree(this->itemURL());
+    TypeParam::removeLockForURL(this->itemURL());
+    EXPECT_FALSE(TypeParam::lockForURL(this->itemURL()));
+    EXPECT_EQ(sockets(), before); // it is presented no more, though somebody has it
 }
 
 TEST_F(PresenterLockTest, OfTwoLocksOfOneFileOneAtATimeIsHeld)

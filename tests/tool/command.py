@@ -1,4 +1,5 @@
 """The command as a process, and small containers built by hand, for the tests beside this file."""
+import atexit
 import json
 import os
 import pathlib
@@ -11,6 +12,9 @@ import tempfile
 import unittest
 
 KTFILES = os.environ["KTFILES"]
+# Nothing of the tests shows in the user's own folder, and runs side by side do not wait for each other.
+os.environ["KTFILES_COORDINATION"] = tempfile.mkdtemp(prefix="ktfiles-coordination-")
+atexit.register(shutil.rmtree, os.environ["KTFILES_COORDINATION"], ignore_errors=True)
 MEDIA = pathlib.Path(os.environ["KTFILES_MEDIA"])
 # What the command is linked to.
 LIBRARY = pathlib.Path(re.search(r"=> (\S*/libKTFiles\.so\S*)",

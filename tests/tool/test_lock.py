@@ -1,4 +1,5 @@
 """ktfiles lock and locks: real processes that hold each other back, and the other verbs among them."""
+import fcntl
 import json
 import os
 import pathlib
@@ -11,7 +12,7 @@ import sys
 import time
 import unittest
 
-from command import KTFILES, MEDIA, CommandTest, chunk, wave
+from command import KTFILES, LIBRARY, MEDIA, CommandTest, chunk, wave
 
 PATIENCE = 30  # seconds until something that must happen is given up
 
@@ -29,6 +30,40 @@ for number in (signal.SIGUSR1, signal.SIGTERM):
 print("ready", flush=True)
 while True:
     signal.pause()
+"""
+
+
+# In a name space of its own, with an empty home and no run-time folder at first.
+PLACES = """
+import os, pwd, shutil, subprocess, sys
+ktfiles, user = sys.argv[1], os.geteuid()
+home = pwd.getpwuid(user).pw_dir
+for place in (home, "/run/user"):
+    if subprocess.run(["mount", "-t", "tmpfs", "-o", f"mode=0700,uid={user}", "tmpfs", place], capture_output=True).returncode:
+        sys.exit(77)
+if not os.path.exists(ktfiles):
+    sys.exit(77)
+state, runtime = home + "/.local/state/ktfiles-coordination", f"/run/user/{user}"
+def hold():
+    process = subprocess.Popen([ktfiles, "lock", "a.wav"], stdin=subprocess.PIPE, stdout=subprocess.PIPE)
+    process.stdout.readline()
+    return process
+def expect_held(process):
+    waiting = subprocess.run([ktfiles, "lock", "--timeout", "0.2", "a.wav", "--", "true"], capture_output=True, text=True)
+    assert f"still in use by process {process.pid} (" in waiting.stderr, waiting.stderr
+    listed = subprocess.run([ktfiles, "locks", "a.wav"], capture_output=True, text=True).stdout
+    assert f"\\t{process.pid}\\t" in listed, listed
+first = hold()
+assert os.stat(state).st_mode & 0o7777 == 0o700
+os.mkdir(runtime, 0o700)
+expect_held(first)
+first.communicate()
+second = hold()
+assert os.path.isdir(runtime + "/ktfiles-coordination")
+shutil.rmtree(runtime)
+expect_held(second)
+second.communicate()
+subprocess.run([ktfiles, "lock", "--timeout", "30", "a.wav", "--", "echo", "good"], check=True)
 """
 
 
@@ -51,7 +86,8 @@ class LockTest(CommandTest):
         return process
 
     def release(self, process):
-        self.assertEqual(process.communicate(timeout=PATIENCE)[1], b"")
+        error = process.communicate(timeout=PATIENCE)[1].decode()  # on a busy machine they say that they wait
+        self.assertEqual([line for line in error.splitlines() if "waiting for process" not in line], [])
         self.assertEqual(process.returncode, 0)
 
     def parties(self, *files):
@@ -198,6 +234,15 @@ class Commands(LockTest):
         error = self.failure("lock", "--read", "a.wav", "--", KTFILES, "chunks", "remove", "a.wav", "note")
         self.assertRegex(error, r"a.wav: is locked for reading by process \d+, which waits for this command")
 
+    def test_the_command_is_known_under_another_name(self):
+        self.write("a.wav", wave())
+        (self.folder / "linked").symlink_to(KTFILES)
+        shutil.copy(KTFILES, self.folder / "copied")
+        environment = {**os.environ, "LD_LIBRARY_PATH": str(LIBRARY.parent)}
+        for other in ("linked", "copied"):
+            self.run_command("lock", "a.wav", "--", "./" + other, "info", "-q", "a.wav", env=environment)
+        self.run_command("lock", "a.wav", "--", "env", "-u", "KTFILES_LOCKS", "./linked", "info", "-q", "a.wav")
+
     def test_a_lock_under_the_lock_is_refused(self):  # it would wait for itself
         for outer in ("--read", "--write", "--presenter"):
             for inner in ("--read", "--write", "--presenter"):
@@ -236,9 +281,44 @@ class OtherVerbs(LockTest):
                 process.stdin = None
                 self.await_waiting(process, "a.aiff", access)
                 self.release(holder)
-                self.assertEqual(process.communicate(timeout=PATIENCE)[1], b"")
-                self.assertEqual(process.returncode, 0)
+                self.release(process)
         self.assert_free("a.aiff")
+
+    def test_a_long_wait_is_told_and_ends_when_it_must(self):
+        self.loop("a.aiff")
+        package = self.folder / "Song.fuguex"
+        (package / "Resources").mkdir(parents=True)
+        (package / "Resources/ProjectInformation.plist").write_text("<plist><dict/></plist>")
+        cases = [("a.aiff", ["info", "a.aiff"]),
+                 ("Song.fuguex", ["project", "rename-alternative", "Song.fuguex", "0", "x"])]
+        for name, command in cases:
+            holder = self.hold(name)
+            process = self.start(*command)
+            line = process.stderr.readline().decode()  # no terminal
+            self.assertRegex(line, rf"^ktfiles: .*{name}: waiting for process {holder.pid} \(ktfiles\) \.\.\.$")
+            self.release(holder)
+            process.communicate(timeout=PATIENCE)
+        holder = self.hold("Song.fuguex")
+        for verb in (["backup"], ["restore", "00"], ["settle"], ["rename-alternative", "0", "x"], ["dirs", "--create"]):
+            error = self.failure("project", verb[0], "--timeout", "0.2", "Song.fuguex", *verb[1:])
+            self.assertEqual(error, f"ktfiles: Song.fuguex: still in use by process {holder.pid} (ktfiles) after 0.2 "
+                                    "seconds\n")
+        self.release(holder)
+        for seconds in ("nan", "inf", "-1", "1s", "", "1e9"):
+            self.assertIn("time in seconds", self.failure("lock", "--timeout=" + seconds, "a", "--", "true", status=2))
+
+    def test_a_lock_on_the_file_itself_is_named(self):
+        path = self.write("a.wav", wave())
+        with open(path, "rb") as file:
+            fcntl.lockf(file, fcntl.LOCK_SH)
+            process = self.start("chunks", "add", "a.wav", "note")
+            process.stdin.close()
+            process.stdin = None
+            self.assertRegex(process.stderr.readline().decode(), rf"a.wav: waiting for process {os.getpid()} \(.*\), "
+                             r"which has locked it for reading \.\.\.$")
+            fcntl.lockf(file, fcntl.LOCK_UN)
+        process.communicate(timeout=PATIENCE)
+        self.assertEqual(process.returncode, 0)
 
     @unittest.skipUnless(os.geteuid() == 0, "only root can spoil another user's folder")
     def test_a_refused_folder(self):
@@ -255,12 +335,31 @@ class OtherVerbs(LockTest):
             os.setuid(user)
         if subprocess.run([KTFILES, "--version"], preexec_fn=become_user, capture_output=True).returncode != 0:
             self.skipTest("the command lies where others cannot run it")
-        error = self.failure("chunks", "add", "a.wav", "note", preexec_fn=become_user)
+        stranger = {"preexec_fn": become_user, "env": self.own_places()}
+        error = self.failure("chunks", "add", "a.wav", "note", **stranger)
         self.assertIn("a.wav: other programs cannot be held back from it: coordination folder", error)
+        self.assertIn("it belongs to root (user 0)", error)
         self.assertEqual(path.read_bytes(), wave())
-        self.run_command("info", "a.wav", preexec_fn=become_user)
-        self.assertIn("cannot be locked: ", self.failure("lock", "a.wav", "--", "true", preexec_fn=become_user))
-        self.assertIn("coordination folder", self.failure("locks", preexec_fn=become_user))
+        self.run_command("info", "a.wav", **stranger)
+        self.assertIn("cannot be locked: ", self.failure("lock", "a.wav", "--", "true", **stranger))
+        self.assertIn("coordination folder", self.failure("locks", **stranger))
+        chosen = self.folder / "chosen"
+        for arguments, env in ((["--coordination", "chosen"], {}), ([], {"KTFILES_COORDINATION": str(chosen)})):
+            command = ["chunks", "add", "a.wav", "note", *arguments]
+            self.run_command(*command, preexec_fn=become_user, env={**self.own_places(), **env})
+            self.assertEqual((chosen.stat().st_uid, chosen.stat().st_mode & 0o777), (user, 0o700))
+            shutil.rmtree(chosen)
+        self.assertIn("no absolute path", self.failure("locks", env={**os.environ, "KTFILES_COORDINATION": "chosen"}))
+
+    def own_places(self):
+        return {name: value for name, value in os.environ.items() if name != "KTFILES_COORDINATION"}
+
+    def test_run_time_folders_that_come_and_go(self):
+        result = subprocess.run(["unshare", "-m", sys.executable, "-c", PLACES, KTFILES], capture_output=True, text=True,
+                                cwd=self.folder, env=self.own_places(), timeout=2 * PATIENCE)
+        if result.returncode == 77 or "unshare" in result.stderr:
+            self.skipTest("the places of this user cannot be replaced here")
+        self.assertEqual((result.stdout, result.stderr), ("good\n", ""))
 
 
 class Listing(LockTest):

@@ -1,10 +1,13 @@
 #include "platform/posix/CoordinationDirectory.h"
 
 #include <algorithm>
+#include <array>
 #include <cerrno>
+#include <optional>
 #include <system_error>
 
 #include <fcntl.h>
+#include <pwd.h>
 #include <sys/file.h>
 #include <sys/stat.h>
 #include <unistd.h>
@@ -16,27 +19,83 @@ namespace {
 constexpr std::size_t kKeptDescriptors = 16;
 constexpr mode_t kOwnerOnly = 0700;
 
+constexpr const char* kName = "ktfiles-coordination";
+
 [[noreturn]] void fail(int error, const std::string& what)
 {
     throw std::system_error(error, std::generic_category(), what);
 }
 
-/// The user's run-time folder where the system keeps one, else a folder in the place for temporary files. The
-/// environment has no say: two processes of a user must never choose differently.
-std::string systemPath()
+struct UserRecord {
+    std::string name, home;
+};
+
+std::optional<UserRecord> userRecord(uid_t user)
 {
-    const std::string user = std::to_string(::geteuid());
-    const std::string runtime = "/run/user/" + user;
+    std::array<char, 16384> text;
+    struct passwd record;
+    struct passwd* found = nullptr;
+    if (::getpwuid_r(user, &record, text.data(), text.size(), &found) != 0 || found == nullptr)
+        return std::nullopt;
+    return UserRecord{found->pw_name, found->pw_dir};
+}
+
+/// "root (user 0)"
+std::string ownerText(uid_t user)
+{
+    const std::string number = "user " + std::to_string(user);
+    const std::optional<UserRecord> record = userRecord(user);
+    return record ? record->name + " (" + number + ")" : number;
+}
+
+/// The user's home, where that is a folder of this user in which the state folder is or can be made; else empty. The
+/// environment has no say in any of this: two processes of a user must never choose differently.
+std::string stateFolder(uid_t user)
+{
+    const std::optional<UserRecord> record = userRecord(user);
+    if (!record || !record->home.starts_with('/'))
+        return {};
     struct stat status;
-    if (::lstat(runtime.c_str(), &status) == 0 && S_ISDIR(status.st_mode) && status.st_uid == ::geteuid())
-        return runtime + "/ktfiles-coordination";
-    return "/tmp/ktfiles-coordination-" + user;
+    if (::stat(record->home.c_str(), &status) != 0 || !S_ISDIR(status.st_mode) || status.st_uid != user)
+        return {};
+    const std::string state = record->home + "/.local/state";
+    const bool isThere = ::lstat((state + '/' + kName).c_str(), &status) == 0;
+    return isThere || ::faccessat(AT_FDCWD, record->home.c_str(), W_OK, AT_EACCESS) == 0 ? state : std::string();
+}
+
+/// The folder in force, then the one that is in force while the user has no run-time folder. In the folder for
+/// temporary files, where anybody may take the name, only for a user without a home.
+std::vector<std::string> systemPaths()
+{
+    static const uid_t user = ::geteuid();
+    static const std::string state = stateFolder(user);
+    const uid_t now = ::geteuid(); // a process may become another user's
+    const std::string number = std::to_string(now);
+    const std::string lasting = now == user ? state : stateFolder(now);
+    std::vector<std::string> paths;
+    const std::string runtime = "/run/user/" + number;
+    struct stat status;
+    if (::lstat(runtime.c_str(), &status) == 0 && S_ISDIR(status.st_mode) && status.st_uid == now)
+        paths.push_back(runtime + '/' + kName);
+    paths.push_back(lasting.empty() ? "/tmp/" + (kName + ('-' + number)) : lasting + '/' + kName);
+    return paths;
+}
+
+/// The folders around one, for this user alone.
+void makeFoldersAround(const std::string& path)
+{
+    for (std::size_t end = path.find('/', 1); end != path.npos; end = path.find('/', end + 1))
+        if (::mkdir(path.substr(0, end).c_str(), kOwnerOnly) != 0 && errno != EEXIST && errno != EACCES &&
+            errno != EROFS)
+            fail(errno, "folder " + path.substr(0, end));
 }
 
 struct Current {
     std::mutex mutex;
-    std::string path;
+    std::string path; // of the directory
     std::shared_ptr<CoordinationDirectory> directory;
+    std::string otherPath;
+    std::shared_ptr<CoordinationDirectory> other;
 };
 
 std::string& chosenPath() // outlives forks, unlike what was opened; guarded by the mutex of Current
@@ -51,15 +110,50 @@ Current& currentState()
     return state.get();
 }
 
+/// The paths that count now, with the mutex held; the folder in force is brought up to date.
+std::vector<std::string> update(Current& state)
+{
+    const bool isChosen = !chosenPath().empty();
+    std::vector<std::string> paths = isChosen ? std::vector<std::string>{chosenPath()} : systemPaths();
+    if (state.directory && state.directory->isCurrent() && state.path == paths.front())
+        return paths;
+    state.directory.reset();
+    if (!isChosen)
+        makeFoldersAround(paths.front());
+    state.directory = std::make_shared<CoordinationDirectory>(paths.front());
+    state.path = paths.front();
+    return paths;
+}
+
 } // namespace
 
 std::shared_ptr<CoordinationDirectory> CoordinationDirectory::current()
 {
     Current& state = currentState();
     const std::lock_guard lock(state.mutex);
-    if (!state.directory || !state.directory->isCurrent())
-        state.directory = std::make_shared<CoordinationDirectory>(chosenPath().empty() ? systemPath() : chosenPath());
+    update(state);
     return state.directory;
+}
+
+std::vector<std::shared_ptr<CoordinationDirectory>> CoordinationDirectory::all()
+{
+    Current& state = currentState();
+    const std::lock_guard lock(state.mutex);
+    const std::vector<std::string> paths = update(state);
+    if (paths.size() == 1)
+        return {state.directory};
+    struct stat status;
+    if (::lstat(paths[1].c_str(), &status) != 0)
+        return {state.directory}; // nobody was ever without a run-time folder
+    if (!state.other || !state.other->isCurrent() || state.otherPath != paths[1])
+        try {
+            state.other = std::make_shared<CoordinationDirectory>(paths[1]);
+            state.otherPath = paths[1];
+        } catch (const std::system_error&) { // not fit to be met in, by nobody
+            state.other.reset();
+            return {state.directory};
+        }
+    return {state.other, state.directory};
 }
 
 void CoordinationDirectory::setPath(std::string path)
@@ -68,23 +162,34 @@ void CoordinationDirectory::setPath(std::string path)
     const std::lock_guard lock(state.mutex);
     chosenPath() = std::move(path);
     state.directory.reset();
+    state.other.reset();
 }
 
 CoordinationDirectory::CoordinationDirectory(const std::string& path)
 {
+    const std::string what = "coordination folder " + path;
+    if (!path.starts_with('/'))
+        fail(EINVAL, what + " is no absolute path");
     const bool made = ::mkdir(path.c_str(), kOwnerOnly) == 0;
     if (!made && errno != EEXIST)
-        fail(errno, "coordination folder " + path);
+        fail(errno, what);
+    struct stat status;
     folder_ = Descriptor([&] { return ::open(path.c_str(), O_RDONLY | O_DIRECTORY | O_NOFOLLOW | O_CLOEXEC); });
-    if (!folder_)
-        fail(errno, "coordination folder " + path);
+    if (!folder_) {
+        const int reason = errno; // which does not say whose it is
+        fail(reason, ::lstat(path.c_str(), &status) != 0 ? what
+                     : status.st_uid != ::geteuid()      ? what + " belongs to " + ownerText(status.st_uid)
+                     : S_ISLNK(status.st_mode)           ? what + " is a link"
+                                                         : what);
+    }
     if (made)
         ::fchmod(folder_.get(), kOwnerOnly); // whatever the process's mask
-    struct stat status;
     if (::fstat(folder_.get(), &status) != 0)
-        fail(errno, "coordination folder " + path);
-    if (status.st_uid != ::geteuid() || (status.st_mode & 07777) != kOwnerOnly)
-        fail(EACCES, "coordination folder " + path + " is not this user's alone");
+        fail(errno, what);
+    if (status.st_uid != ::geteuid())
+        fail(EACCES, what + " is not this user's: it belongs to " + ownerText(status.st_uid));
+    if ((status.st_mode & 07777) != kOwnerOnly)
+        fail(EACCES, what + " is not this user's alone: others may enter it");
     ::flock(folder_.get(), LOCK_SH | LOCK_NB); // whoever cleans temporary files leaves locked folders alone
 }
 

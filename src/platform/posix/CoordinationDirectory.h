@@ -19,6 +19,9 @@ public:
     /// The folder in force; opened, and made, when it has to be. Throws std::system_error when it is missing and cannot
     /// be made, is not ours, or open to others.
     static std::shared_ptr<CoordinationDirectory> current();
+    /// Those in which others may have locks: the one in force last, ahead of it what processes left or made that knew
+    /// no run-time folder. Whoever takes locks in several takes them in this order.
+    static std::vector<std::shared_ptr<CoordinationDirectory>> all();
     /// Replaces the folder for what begins from now on; empty goes back to the system's place.
     static void setPath(std::string path);
 

@@ -9,6 +9,7 @@
 #include <cstdio>
 #include <filesystem>
 #include <fstream>
+#include <memory>
 #include <sstream>
 #include <system_error>
 #include <tuple>
@@ -77,10 +78,12 @@ void addParties(int process, int stripe, const std::vector<HeldLock>& locks, std
     }
 }
 
-std::vector<CoordinationParty> partiesIn(const std::string& folder)
+std::vector<CoordinationParty> partiesIn(const std::vector<std::shared_ptr<CoordinationDirectory>>& folders)
 {
     std::vector<CoordinationParty> parties;
-    const std::string prefix = folder + "/" + CoordinationDirectory::stripeName(0).substr(0, 7);
+    std::vector<std::string> prefixes;
+    for (const auto& folder : folders)
+        prefixes.push_back(folder->path() + "/" + CoordinationDirectory::stripeName(0).substr(0, 7));
     std::error_code ignored; // processes end while they are looked at, and those of others show nothing
     for (const auto& process : fs::directory_iterator("/proc", ignored)) {
         const std::string name = process.path().filename();
@@ -91,9 +94,10 @@ std::vector<CoordinationParty> partiesIn(const std::string& folder)
         for (fs::directory_iterator one(process.path() / "fd", notOurs), end; !notOurs && one != end;
              one.increment(notOurs)) {
             std::error_code closed;
-            const int stripe = stripeOf(fs::read_symlink(one->path(), closed), prefix);
-            if (stripe >= 0)
-                addParties(id, stripe, locksOf(process.path() / "fdinfo" / one->path().filename()), parties);
+            const std::string target = fs::read_symlink(one->path(), closed);
+            for (const std::string& prefix : prefixes)
+                if (const int stripe = stripeOf(target, prefix); stripe >= 0)
+                    addParties(id, stripe, locksOf(process.path() / "fdinfo" / one->path().filename()), parties);
         }
     }
     const auto order = [](const CoordinationParty& a) {
@@ -115,7 +119,7 @@ std::uint64_t coordinationItemNumber(const CoordinatedItem& item)
 std::vector<CoordinationParty> coordinationParties(Error* error)
 {
     try {
-        return partiesIn(CoordinationDirectory::current()->path());
+        return partiesIn(CoordinationDirectory::all());
     } catch (const std::system_error& failure) {
         fail(error, ErrorDomain::system, failure.code().value(), failure.what());
         return {};

@@ -6,7 +6,9 @@
 #include "platform/posix/ItemAccess.h"
 #include "platform/posix/PresenterRegistry.h"
 
+#include <algorithm>
 #include <cerrno>
+#include <deque>
 #include <memory>
 #include <system_error>
 
@@ -24,15 +26,20 @@ bool failOfInvalidItem(Error* error)
     return fail(error, ErrorDomain::status, kStatusBadReference, "file coordination: a URL without a path");
 }
 
+/// In every folder in which others may look, mostly one.
 struct OpenAccess final : CoordinatedAccess {
-    OpenAccess(const CoordinatedItem& coordinated, std::shared_ptr<CoordinationDirectory> directory,
-               const FilePresenter* own)
-        : CoordinatedAccess(coordinated.url()),
-          item(std::move(directory), coordinated.key(), own)
+    OpenAccess(const CoordinatedItem& coordinated, const FilePresenter* own) : CoordinatedAccess(coordinated.url())
     {
+        for (auto& directory : CoordinationDirectory::all())
+            places.emplace_back(std::move(directory), coordinated.key(), own);
     }
 
-    ItemAccess item;
+    bool isSeen()
+    {
+        return std::all_of(places.begin(), places.end(), [](ItemAccess& place) { return place.isSeen(); });
+    }
+
+    std::deque<ItemAccess> places;
 };
 
 } // namespace
@@ -99,10 +106,11 @@ std::unique_ptr<CoordinatedAccess> FileCoordinator::tryToOpen(const CoordinatedI
     if (!item.isValid())
         return nullptr;
     try {
-        auto access = std::make_unique<OpenAccess>(item, CoordinationDirectory::current(), presenter_.get());
-        const bool isHad =
-            kind == Kind::reading ? access->item.tryToAcquireForReading() : access->item.tryToAcquireForWriting();
-        return isHad && access->item.isSeen() ? std::move(access) : nullptr;
+        auto access = std::make_unique<OpenAccess>(item, presenter_.get());
+        const bool isHad = std::all_of(access->places.begin(), access->places.end(), [&](ItemAccess& place) {
+            return kind == Kind::reading ? place.tryToAcquireForReading() : place.tryToAcquireForWriting();
+        });
+        return isHad && access->isSeen() ? std::move(access) : nullptr;
     } catch (const std::system_error&) {
         return nullptr;
     }
@@ -126,16 +134,17 @@ std::unique_ptr<CoordinatedAccess> FileCoordinator::open(const CoordinatedItem& 
         std::shared_ptr<CoordinationDirectory> directory;
         try {
             directory = CoordinationDirectory::current();
-            auto access = std::make_unique<OpenAccess>(item, directory, presenter_.get());
-            if (kind == Kind::reading)
-                access->item.acquireForReading();
-            else
-                access->item.acquireForWriting(kind == Kind::writing);
-            if (access->item.isSeen())
+            auto access = std::make_unique<OpenAccess>(item, presenter_.get());
+            for (ItemAccess& place : access->places)
+                if (kind == Kind::reading)
+                    place.acquireForReading();
+                else
+                    place.acquireForWriting(kind == Kind::writing);
+            if (access->isSeen())
                 return access;
             PresenterRegistry::shared().followFolder(); // or nobody there would ask the presenter that acquires this
         } catch (const std::system_error& failure) {
-            if (!directory || directory->isCurrent()) {
+            if (failure.code().value() != ESTALE && (!directory || directory->isCurrent())) {
                 failOf(failure, error);
                 return nullptr;
             }

@@ -13,7 +13,7 @@
 
 #include <nlohmann/json.hpp>
 
-#include <filesystem>
+#include <cstdlib>
 #include <limits>
 
 namespace {
@@ -162,7 +162,6 @@ void declareEdits(CommandLine& commandLine, CLI::App& project, ProjectArguments&
             },
             &project);
         addPackage(verb, arguments);
-        addTimeout(verb, arguments.wait.timeoutSeconds);
         return verb;
     };
     CLI::App& backup = edit("backup", "Back up an alternative's project data", backUp);
@@ -195,6 +194,14 @@ void declareEdits(CommandLine& commandLine, CLI::App& project, ProjectArguments&
         ->check(indexRange());
     rename.add_option("NAME", arguments.name, "Its new name")->option_text(" ")->required();
     CommandLine::addEditOptions(rename, arguments.edit);
+
+    for (CLI::App* verb : {&backup, &back, &settle, &rename})
+        if (CLI::Option* timeout = verb->get_option_no_throw("--timeout")) // of the edit options: for the package too
+            timeout->each([&arguments](const std::string& text) {
+                arguments.wait.timeoutSeconds = std::strtod(text.c_str(), nullptr);
+            });
+        else
+            addTimeout(*verb, arguments.wait.timeoutSeconds);
 }
 
 void declareProject(CommandLine& commandLine)

@@ -114,7 +114,9 @@ int openLeasedFile(const char* path, OpenFor access, Links links)
     if (item < 0)
         return -1;
     const std::string itself = "/proc/self/fd/" + std::to_string(item);
-    const int descriptor = ::open(itself.c_str(), openFlags(access, Waiting::yes));
+    int descriptor = ::open(itself.c_str(), openFlags(access, Waiting::yes));
+    if (descriptor < 0 && errno == ENOENT) // no /proc here
+        descriptor = openPath(path, openFlags(access, Waiting::yes), links);
     const int reason = errno;
     ::close(item);
     errno = reason;

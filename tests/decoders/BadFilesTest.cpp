@@ -175,11 +175,12 @@ TEST(BadFiles, ABrokenPacketIsSilenceAndMovesNothing)
     writeSound(folder / "source.wav", frames, 1, 44100, 16);
     ASSERT_TRUE(runs(folder,
                      "ffmpeg -i source.wav a.flac && ffmpeg -i source.wav -c:a alac a.m4a && "
-                     "ffmpeg -i source.wav a.tta && ffmpeg -i source.wav a.wv && oggenc -Q source.wav -o a.ogg"));
-    for (const std::string name : {"a.flac", "a.m4a", "a.tta", "a.wv", "a.ogg"}) {
+                     "ffmpeg -i source.wav a.tta && ffmpeg -i source.wav a.wv && oggenc -Q source.wav -o a.ogg && "
+                     "ffmpeg -i source.wav -c:a flac a.mka"));
+    for (const std::string name : {"a.flac", "a.m4a", "a.tta", "a.wv", "a.ogg", "a.mka"}) {
         const Bytes whole = allFramesOf(*openReader(folder / name), 4096);
         Bytes broken = readFile(folder / name);
-        for (std::size_t i = 0; i < (name == "a.ogg" ? 1u : 600u); ++i) // less than a packet of these
+        for (std::size_t i = 0; i < (name == "a.ogg" || name == "a.mka" ? 8u : 600u); ++i) // less than a packet
             broken[broken.size() / 2 + i] = std::byte{0x55};
         const auto reader = openReader(folder.write(name, BytesView(broken)));
         ASSERT_TRUE(reader) << name;
@@ -198,6 +199,10 @@ TEST(BadFiles, ABrokenPacketIsSilenceAndMovesNothing)
         EXPECT_GT(different, 500u) << name;
         EXPECT_GE(reader->missingFrames(), different * 9 / 10) << name;
         EXPECT_LE(reader->missingFrames(), different + 10) << name; // of which some were silent
+        std::uint64_t missing = 0;
+        std::uint32_t size = sizeof missing;
+        EXPECT_EQ(reader->property(ConvertingReader::missingFramesProperty, size, &missing), 0) << name;
+        EXPECT_EQ(missing, reader->missingFrames()) << name;
         const std::uint64_t middle = frames / 2;
         const Bytes after = framesOf(*reader, middle, 3000);
         EXPECT_TRUE(
@@ -230,6 +235,7 @@ TEST(BadFiles, FLACIsComparedWithItsChecksum)
                 allFramesOf(*reader, 3000);
                 EXPECT_EQ(reader->checksum(), isOther ? Checksum::differs : Checksum::same) << bits;
             }
+            EXPECT_EQ(reader->missingFrames(), 0u) << bits;
         }
     }
 }

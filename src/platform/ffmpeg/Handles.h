@@ -26,8 +26,8 @@ using Frame = std::unique_ptr<AVFrame, Release>;
 using Packet = std::unique_ptr<AVPacket, Release>;
 
 /// Takes a message of a context beyond every level: a host may show what its own contexts say. The log looks at the low
-/// 8 bits.
-constexpr int kLogLevelOffset = 128;
+/// 8 bits, and FFmpeg adds up to 127 itself.
+constexpr int kLogLevelOffset = 64;
 
 // These throw std::bad_alloc.
 CodecParameters makeCodecParameters();

@@ -69,6 +69,14 @@ std::shared_ptr<Lock> makeLock(const URLRef& url)
         return Lock::initLockForWritingAtURL(url);
 }
 
+/// Until a handler is called on this thread: those of the acquisition have all returned.
+template <class Lock>
+void retainUntilCalledAtOnce(Lock& lock)
+{
+    for (auto caller = std::make_shared<std::atomic<std::thread::id>>(); *caller != std::this_thread::get_id();)
+        lock.retainLockWithFinishedHandler([caller] { *caller = std::this_thread::get_id(); });
+}
+
 /// Both classes count alike.
 template <class Lock>
 class LockCountTest : public CoordinationFolder {
@@ -139,9 +147,7 @@ TYPED_TEST(LockCountTest, WhoRetainsDuringTheFirstHandlerIsCalledBehindTheOthers
     awaitFree(this->itemURL());
     this->lock->retainLockWithFinishedHandler(this->calls.handler('d'));
     this->calls.await(4);
-    // All were called, or nearly so: then one is called at once, on this thread.
-    for (auto caller = std::make_shared<std::atomic<std::thread::id>>(); *caller != std::this_thread::get_id();)
-        this->lock->retainLockWithFinishedHandler([caller] { *caller = std::this_thread::get_id(); });
+    retainUntilCalledAtOnce(*this->lock);
     this->lock->resetLock();
 }
 
@@ -196,14 +202,16 @@ TYPED_TEST(LockCountTest, TheTableKnowsALockUntilItIsRemoved)
     EXPECT_NE(TypeParam::_logLocks().find("\nLocked: YES Count:   1 " + std::string(presents ? "R: NO  W: NO  " : "") +
                                           "Path: '" + this->item() + "'"),
               std::string::npos);
+    retainUntilCalledAtOnce(*kept);
+    const std::int64_t count = kept->lockCount();
     // What a host's handler throws comes back to the host, and costs the table nothing.
     EXPECT_THROW(retainByURL<TypeParam>(this->itemURL(), [] { throw 1; }), int);
-    EXPECT_EQ(kept->lockCount(), 2);
+    EXPECT_EQ(kept->lockCount(), count + 1);
     kept->resetLock();
     awaitFree(this->itemURL());
     TypeParam::removeLockForURL(this->itemURL());
     EXPECT_FALSE(TypeParam::lockForURL(this->itemURL()));
-    EXPECT_EQ(sockets(), before); // it is presented no more, though somebody has it
+    EXPECT_LE(sockets(), before); // it is presented no more, though somebody has it
 }
 
 TEST_F(PresenterLockTest, OfTwoLocksOfOneFileOneAtATimeIsHeld)

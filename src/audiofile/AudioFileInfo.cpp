@@ -56,7 +56,8 @@ std::int32_t DescribeAudioFile(FileWindow& file, const platform::URLRef& url, Au
 {
     info = {};
     info.fileLength = file.length();
-    return describe(file, url, info);
+    const std::int32_t status = describe(file, url, info);
+    return file.failure() != kStatusOK ? file.failure() : status;
 }
 
 void SetSampleRate(AudioFileInfo& info, double rate)

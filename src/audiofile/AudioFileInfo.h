@@ -65,8 +65,8 @@ struct KT_EXPORT AudioFileInfo {
 };
 
 /// Describes the file that `file` has open. 0; -39 for a file that ends in its header; kStatusParameterError for one
-/// that is no audio file known here, `info` then holding what was understood (fileType 0, fileLength). `permission` is
-/// the mode that the file was opened with. The mark stays where it was.
+/// that is no audio file known here, `info` then holding what was understood (fileType 0, fileLength); the status of a
+/// read that failed. `permission` is the mode that the file was opened with. The mark stays where it was.
 ///
 /// Compressed files outside the containers, MP3, AAC and M4A, are opened a second time by their path, and so not known
 /// in memory; what only the decoder module could describe is "fmt?" where it does not (platform/ConvertingReader.h says

@@ -67,11 +67,12 @@ std::int32_t CAudioFileIO::Open(const CFileRef& ref, unsigned int permission)
 /// A file that is no audio file is open all the same, and described as far as it was understood.
 void CAudioFileIO::Describe(unsigned int permission)
 {
+    auto window = std::make_unique<FileWindow>(*this, IsOpenForWriting() ? GetEOF() : LengthAtOpen());
+    mInfoStatus = DescribeAudioFile(*window, IsMemoryFile() ? nullptr : URL(), mInfo);
+    mReadFailure = window->failure();
     if ((permission & (kFileIOReadWrite | kFileIOMemory)) == 0) {
-        mWindow = std::make_unique<FileWindow>(*this, LengthAtOpen());
-        DescribeAudioFile(*mWindow, URL(), mInfo);
-    } else {
-        GetAudioFileInfo(*this, permission, mInfo);
+        mWindow = std::move(window);
+        mWindowStamp = StampAtOpen();
     }
     const bool singleFloats = mInfo.bitsPerSample == 32 && mInfo.floatingPoint;
     mSampleFormat = singleFloats ? -32 : mInfo.bitsPerSample;
@@ -88,14 +89,27 @@ void CAudioFileIO::Describe(unsigned int permission)
 std::int32_t CAudioFileIO::Close()
 {
     const std::int32_t updated = UpdateHeader();
+    ForgetFile();
+    const std::int32_t closed = CFileIO::Close();
+    return updated != kStatusOK ? updated : closed;
+}
+
+void CAudioFileIO::Init()
+{
+    ForgetFile();
+    CFileIO::Init();
+}
+
+/// All that is known of the file that was open.
+void CAudioFileIO::ForgetFile()
+{
     mDecoder.reset();
     mWindow.reset();
     mInfo = {};
+    mInfoStatus = mReadFailure = kStatusOK;
     mSampleFormat = 0;
     mHeaderDirty = false;
     mHeaderOption = false;
-    const std::int32_t closed = CFileIO::Close();
-    return updated != kStatusOK ? updated : closed;
 }
 
 std::int32_t CAudioFileIO::CreateAndOpenCommon(const CFileRef& ref, long cacheSize, TAudioBusFormat busFormat,

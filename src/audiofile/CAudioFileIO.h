@@ -35,8 +35,8 @@ struct ContainerExtent {
     std::int64_t fileLength = 0;
 };
 
-/// Of a file that is open for reading only, container headers are kept once read: what another writes there meanwhile
-/// is seen when it is opened anew.
+/// Of a file that is open for reading only, container headers are kept once read, until the file's length or the time
+/// of its last change is another. The description stays that of the time when it was opened.
 class KT_EXPORT CAudioFileIO : public CFileIO {
 public:
     CAudioFileIO();
@@ -44,15 +44,19 @@ public:
     CAudioFileIO(const CFileRef& ref, unsigned int permission);
     ~CAudioFileIO() override;
 
+    void Init() override;
     /// The status of the base open; kStatusFileNotFound for write access to what is missing or a directory.
-    std::int32_t Open(const CFileRef& ref, unsigned int permission);
-    std::int32_t Close();
+    std::int32_t Open(const CFileRef& ref, unsigned int permission) override;
+    std::int32_t Close() override;
     /// Creates (or empties) a file, writes its header for no frames and opens it for writing. `cacheSize` is the read
     /// cache in KiB; `channels` of 0 stands for those of the bus format; `headerOption` as in BuildAudioFileHeader.
     std::int32_t CreateAndOpenCommon(const CFileRef& ref, long cacheSize, TAudioBusFormat busFormat, int channels,
                                      int bitsPerSample, long sampleRate, unsigned int fileType, bool headerOption);
 
     const AudioFileInfo& Info() const { return mInfo; }
+    /// What GetAudioFileInfo gave when the file was opened. After a read that failed the description is not all that
+    /// the file holds: nothing is added to such a file, removed from it or cut off.
+    std::int32_t InfoStatus() const { return mInfoStatus; }
     /// Bits per sample; -32 for 32-bit floats.
     std::int32_t SampleFormat() const { return mSampleFormat; }
 
@@ -66,13 +70,17 @@ public:
     long long NextChunkHeader(long long position, ChkHeader* current, ChkHeader* next, int* error,
                               const ContainerChkExtended& header);
     /// Calls `visit` for every chunk in file order until it returns false; CAF too. 0 (also when stopped), -1 not open,
-    /// -2 no container, -3 header unreadable.
+    /// -2 no container, -3 header unreadable, else the status of a read that failed.
     std::int32_t ForEachChunk(const std::function<bool(const ChunkEntry&)>& visit, ContainerExtent* extent = nullptr);
 
     /// 1 found, 0 not found, or an error. Of several chunks of an id the last is found; in CAF the first with a size
     /// above 0. `data` may be null; else it receives an array for delete[].
+    ///
+    /// Kept: of a CAF file whose headers cannot be read, not found; LocateChunk tells.
     std::int32_t FindChunk(unsigned int id, char** data, long* size, long long* position, long long* next);
     std::int32_t FindChunk(unsigned int id, CChunkData& chunk);
+    /// Where the same chunk stands, and how long it says that it is; a read that failed is an error in CAF too.
+    std::int32_t LocateChunk(FourCC id, ChunkEntry& chunk);
     /// The body, or none when it is not found or unreadable.
     std::optional<Bytes> FindChunk(unsigned int id);
     /// Puts a chunk behind the container's last; `replace` first removes every chunk of that id. 1 added, 0 no chunked
@@ -160,13 +168,19 @@ private:
         bool HasItsBytes() const { return size >= 0 && size <= fileLength - body; }
     };
     std::int32_t Locate(FourCC id, FoundChunk& found);
+    std::int32_t Find(FourCC id, FoundChunk& found);
     FileWindow& Window(std::optional<FileWindow>& own);
+    std::int32_t PrepareToEdit();
+    void ForgetFile();
     std::int32_t ReadBytes(void* to, const FoundChunk& found);
     std::int32_t ReadBody(const FoundChunk& found, std::unique_ptr<char[]>& data);
     void Describe(unsigned int permission);
 
     AudioFileInfo mInfo;
+    std::int32_t mInfoStatus = 0;
+    std::int32_t mReadFailure = 0;                        // the one that the description met
     std::unique_ptr<FileWindow> mWindow;                  // on a file that is open for reading; null otherwise
+    FileStamp mWindowStamp;                               // of the file when the window was opened
     std::unique_ptr<platform::ConvertingReader> mDecoder; // of compressed data; null until it is read
     std::int32_t mSampleFormat = 0;
     bool mHeaderDirty = false;

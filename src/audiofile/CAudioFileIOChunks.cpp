@@ -56,11 +56,19 @@ long long CAudioFileIO::NextChunkHeader(long long position, ChkHeader* current, 
     return result;
 }
 
-/// Of a file that is open for reading the window stays for all that is asked of it; one that is written to needs a new
-/// one each time, which the caller keeps.
+/// Of a file that is open for reading the window stays for all that is asked of it, until the file is another; one that
+/// is written to needs a new one each time, which the caller keeps.
 FileWindow& CAudioFileIO::Window(std::optional<FileWindow>& own)
 {
-    return mWindow ? *mWindow : own.emplace(*this, GetEOF());
+    if (!mWindow)
+        return own.emplace(*this, GetEOF());
+    FileStamp now;
+    if (GetStamp(now) == kStatusOK && now != mWindowStamp) {
+        mWindow = std::make_unique<FileWindow>(*this, now.length);
+        mWindowStamp = now;
+        SetCache(CacheBlock()); // what it holds is of the file as it was
+    }
+    return *mWindow;
 }
 
 std::int32_t CAudioFileIO::ForEachChunk(const std::function<bool(const ChunkEntry&)>& visit, ContainerExtent* extent)
@@ -73,11 +81,10 @@ std::int32_t CAudioFileIO::ForEachChunk(const std::function<bool(const ChunkEntr
     if (IsOpenCAF()) {
         if (extent != nullptr)
             *extent = {kCaff, window.length(), window.length()};
-        WalkCAFChunks(window, [&](FourCC id, std::int64_t position, std::int64_t size) {
+        return WalkCAFChunks(window, [&](FourCC id, std::int64_t position, std::int64_t size) {
             const std::int64_t toTheEnd = window.length() - position - std::int64_t{sizeof(CAFChunkHeader)};
             return visitor(id, position, size == -1 && id == kData ? toTheEnd : size);
         });
-        return kStatusOK;
     }
     if (ContainerKind(window) == 0)
         return kNoContainer;
@@ -90,7 +97,7 @@ std::int32_t CAudioFileIO::ForEachChunk(const std::function<bool(const ChunkEntr
     const std::int32_t status = WalkChunks(window, header, end, [&](const WalkedChunk& chunk) {
         return visitor(chunk.header.id, chunk.position, chunk.size);
     });
-    return status == kFirstChunkUnreadable ? kHeaderUnreadable : kStatusOK;
+    return status == kWalkStuck ? std::int32_t{kStatusOK} : status;
 }
 
 /// The walk goes on behind a match, so that the last of several chunks is the one found; in CAF it is the first that is
@@ -107,17 +114,18 @@ std::int32_t CAudioFileIO::Locate(FourCC id, FoundChunk& found)
         result = kFound;
     };
     if (IsOpenCAF()) {
-        WalkCAFChunks(window, [&](FourCC chunkId, std::int64_t position, std::int64_t size) {
-            const bool matches = chunkId == id && size > 0;
-            std::int64_t next = 0;
-            if (matches) {
-                if (__builtin_add_overflow(position + std::int64_t{sizeof(CAFChunkHeader)}, size, &next))
-                    next = INT64_MAX;
-                keep(position, sizeof(CAFChunkHeader), size, next);
-            }
-            return !matches;
-        });
-        return result;
+        const std::int32_t status =
+            WalkCAFChunks(window, [&](FourCC chunkId, std::int64_t position, std::int64_t size) {
+                const bool matches = chunkId == id && size > 0;
+                std::int64_t next = 0;
+                if (matches) {
+                    if (__builtin_add_overflow(position + std::int64_t{sizeof(CAFChunkHeader)}, size, &next))
+                        next = INT64_MAX;
+                    keep(position, sizeof(CAFChunkHeader), size, next);
+                }
+                return !matches;
+            });
+        return status == kStatusOK ? result : status;
     }
     if (ContainerKind(window) == 0)
         return kNoContainer;
@@ -130,7 +138,22 @@ std::int32_t CAudioFileIO::Locate(FourCC id, FoundChunk& found)
             keep(chunk.position, sizeof(ChkHeader), chunk.size, chunk.next);
         return true;
     });
-    return status == kFirstChunkUnreadable ? kHeaderUnreadable : result;
+    return status == kStatusOK || status == kWalkStuck ? result : status;
+}
+
+std::int32_t CAudioFileIO::Find(FourCC id, FoundChunk& found)
+{
+    const std::int32_t result = Locate(id, found);
+    const bool isFailure = result != kFound && result != kNotOpen;
+    return IsOpenCAF() && isFailure ? kNotFound : result;
+}
+
+std::int32_t CAudioFileIO::LocateChunk(FourCC id, ChunkEntry& chunk)
+{
+    FoundChunk found;
+    const std::int32_t result = Locate(id, found);
+    chunk = {result == kFound ? id : 0, found.position, found.size};
+    return result;
 }
 
 std::int32_t CAudioFileIO::ReadBytes(void* to, const FoundChunk& found)
@@ -167,7 +190,7 @@ std::int32_t CAudioFileIO::FindChunk(unsigned int id, char** data, long* size, l
     if (size == nullptr || position == nullptr || next == nullptr)
         return kStatusParameterError;
     FoundChunk found;
-    const std::int32_t result = Locate(id, found);
+    const std::int32_t result = Find(id, found);
     if (result != kFound)
         return result;
     std::unique_ptr<char[]> body;
@@ -186,7 +209,7 @@ std::int32_t CAudioFileIO::FindChunk(unsigned int id, CChunkData& chunk)
     chunk.data.reset();
     chunk.size = chunk.position = chunk.next = 0;
     FoundChunk found;
-    const std::int32_t result = Locate(id, found);
+    const std::int32_t result = Find(id, found);
     if (result != kFound)
         return result;
     if (const std::int32_t status = ReadBody(found, chunk.data); status != kStatusOK)
@@ -201,7 +224,7 @@ std::int32_t CAudioFileIO::FindChunk(unsigned int id, CChunkData& chunk)
 std::optional<Bytes> CAudioFileIO::FindChunk(unsigned int id)
 {
     FoundChunk found;
-    if (Locate(id, found) != kFound || !found.HasItsBytes())
+    if (Find(id, found) != kFound || !found.HasItsBytes())
         return std::nullopt;
     Bytes body(static_cast<std::size_t>(found.size));
     if (ReadBytes(body.data(), found) != kStatusOK)

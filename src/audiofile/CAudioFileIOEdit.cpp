@@ -10,14 +10,23 @@ constexpr std::int32_t kNotRemoved = -7;
 
 } // namespace
 
+/// What is still in the write cache belongs to the file; by a header that does not count the samples yet, a walk would
+/// end among them; and without a description nobody knows where the samples begin.
+std::int32_t CAudioFileIO::PrepareToEdit()
+{
+    if (mReadFailure != kStatusOK)
+        return mReadFailure;
+    const std::int32_t status = FlushWCache();
+    return status != kStatusOK ? status : UpdateHeader();
+}
+
 std::int32_t CAudioFileIO::AddChunk(unsigned int id, const void* data, long size, bool replace)
 {
     if (!IsOpenForWriting())
         return kNotWritable;
     if (size < 0 || (data == nullptr && size > 0))
         return kStatusParameterError;
-    // By a header that does not count the samples yet, a walk would end among them.
-    if (const std::int32_t status = UpdateHeader(); status != kStatusOK)
+    if (const std::int32_t status = PrepareToEdit(); status != kStatusOK)
         return status;
     ContainerEditor editor(*this, mInfo);
     if (replace && editor.remove(id) != kStatusOK)
@@ -37,7 +46,7 @@ std::int32_t CAudioFileIO::AddChunk(unsigned int id, BytesView data, bool replac
 
 std::int32_t CAudioFileIO::RemoveChunk(unsigned int id)
 {
-    if (const std::int32_t status = UpdateHeader(); status != kStatusOK)
+    if (const std::int32_t status = PrepareToEdit(); status != kStatusOK)
         return status;
     return ContainerEditor(*this, mInfo).remove(id);
 }

@@ -18,6 +18,12 @@ std::int64_t padOf(std::int64_t size)
     return size & 1;
 }
 
+/// A read that failed comes ahead of what was made of its absence.
+std::int32_t unlessUnreadable(const FileWindow& window, std::int32_t status)
+{
+    return window.failure() != kStatusOK ? window.failure() : status;
+}
+
 } // namespace
 
 /// The chunk behind which a new one goes.
@@ -36,7 +42,9 @@ std::int32_t ContainerEditor::append(FourCC id, BytesView body)
 /// not closed first, so that what is put behind it becomes part of it; callers who may meet one look before.
 std::int32_t ContainerEditor::appendToCAF(FourCC id, BytesView body)
 {
-    const std::int64_t end = file_.GetEOF();
+    long long end = 0;
+    if (const std::int32_t status = file_.GetEOF(&end); status != kStatusOK)
+        return status;
     CAFChunkHeader header{id, static_cast<std::int64_t>(body.size())};
     header.id.swap();
     header.size.swap();
@@ -47,9 +55,12 @@ std::int32_t ContainerEditor::appendToCAF(FourCC id, BytesView body)
 /// Whether the sizes can be said is known before anything is written.
 std::int32_t ContainerEditor::appendToContainer(FourCC id, BytesView body)
 {
-    FileWindow window(file_, file_.GetEOF());
+    long long length = 0;
+    if (const std::int32_t status = file_.GetEOF(&length); status != kStatusOK)
+        return status;
+    FileWindow window(file_, length);
     if (ContainerKind(window) == 0)
-        return kNoChunkedContainer;
+        return unlessUnreadable(window, kNoChunkedContainer);
     ContainerChkExtended header;
     if (ReadContainerHeader(window, header) != kStatusOK)
         return kHeaderUnreadable;
@@ -178,20 +189,23 @@ std::int32_t ContainerEditor::storeSizesOutright(const ContainerChkExtended& hea
         }
         return status == kStatusOK;
     });
-    return status;
+    return unlessUnreadable(window, status);
 }
 
 /// One pass finds all of them, the cuts are made together, and what stands ahead of the samples is renamed at last: the
 /// same bytes as finding and removing the last one again and again, in linear time.
 std::int32_t ContainerEditor::remove(FourCC id)
 {
-    FileWindow window(file_, file_.GetEOF());
+    long long length = 0;
+    if (const std::int32_t status = file_.GetEOF(&length); status != kStatusOK)
+        return status;
+    FileWindow window(file_, length);
     ContainerChkExtended header;
     if (ReadContainerHeader(window, header) != kStatusOK)
         return kHeaderUnreadable;
-    std::vector<Extent> found = findAll(window, id, header);
-    if (found.empty())
-        return kStatusOK;
+    std::vector<Extent> found;
+    if (const std::int32_t status = findAll(window, id, header, found); status != kStatusOK || found.empty())
+        return status;
     if (!file_.IsOpenForWriting())
         return kStatusNotOpen;
 
@@ -211,10 +225,10 @@ std::int32_t ContainerEditor::remove(FourCC id)
 }
 
 /// In file order. A chunk that has not all of its bytes is not removed; of a container other than CAF, none is then.
-std::vector<ContainerEditor::Extent> ContainerEditor::findAll(FileWindow& window, FourCC id,
-                                                              const ContainerChkExtended& header) const
+/// The status of a read that failed: behind an unreadable header the hole would seem to reach to the end of the file.
+std::int32_t ContainerEditor::findAll(FileWindow& window, FourCC id, const ContainerChkExtended& header,
+                                      std::vector<Extent>& found) const
 {
-    std::vector<Extent> found;
     bool isComplete = true;
     if (isCAF()) {
         WalkCAFChunks(window, [&](FourCC chunkId, std::int64_t position, std::int64_t size) {
@@ -224,10 +238,10 @@ std::vector<ContainerEditor::Extent> ContainerEditor::findAll(FileWindow& window
                 found.push_back({position, body + size});
             return isComplete;
         });
-        return found;
+        return window.failure();
     }
     if (ContainerKind(window) == 0)
-        return found;
+        return window.failure();
     WalkChunks(window, header, ContainerEnd(header, window.length()), [&](const WalkedChunk& chunk) {
         if (chunk.header.id == id) {
             found.push_back({chunk.position, chunk.next});
@@ -238,7 +252,7 @@ std::vector<ContainerEditor::Extent> ContainerEditor::findAll(FileWindow& window
     });
     if (!isComplete)
         found.clear();
-    return found;
+    return window.failure();
 }
 
 /// Closes the holes, which are in file order: what lies between them is moved down, at last the rest of the file.

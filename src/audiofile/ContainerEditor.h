@@ -29,7 +29,7 @@ public:
 
     /// kAdded, kNoChunkedContainer, or an error.
     std::int32_t append(FourCC id, BytesView body);
-    /// 0, also when there was none, or an error.
+    /// 0, also when there was none, or an error. Nothing is removed when a header cannot be read.
     std::int32_t remove(FourCC id);
 
 private:
@@ -52,7 +52,8 @@ private:
     std::int32_t writeContainerHeader(ContainerChkExtended header);
     std::int32_t storeSizesOutright(const ContainerChkExtended& header);
 
-    std::vector<Extent> findAll(FileWindow& window, FourCC id, const ContainerChkExtended& header) const;
+    std::int32_t findAll(FileWindow& window, FourCC id, const ContainerChkExtended& header,
+                         std::vector<Extent>& found) const;
     std::int32_t cutOut(const std::vector<Extent>& holes);
     std::int32_t movePiece(std::int64_t from, std::int64_t to, std::int64_t count);
     std::int32_t shrink(ContainerChkExtended header, const std::vector<Extent>& holes);

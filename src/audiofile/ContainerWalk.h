@@ -43,7 +43,8 @@ inline std::int64_t ContainerEnd(const ContainerChkExtended& header, std::int64_
 }
 
 /// Calls `visit(const WalkedChunk&)` for each chunk up to `end` until it returns false. 0, also when stopped; -3 when
-/// the first header cannot be read; -8 when a step led nowhere.
+/// the first header cannot be read; -8 when a step led nowhere; else the status of a read that failed: then nobody
+/// knows whether chunks follow, nor where the one ahead ends, and that one is not visited either.
 template <class Visit>
 std::int32_t WalkChunks(FileWindow& file, const ContainerChkExtended& header, std::int64_t end, Visit&& visit)
 {
@@ -56,6 +57,9 @@ std::int32_t WalkChunks(FileWindow& file, const ContainerChkExtended& header, st
     for (;;) {
         ChkHeader following;
         chunk.next = NextChunkFrom(read, file.length(), header, chunk.position, chunk.header, following, error);
+        const bool readsNothing = chunk.header.id == 0 && chunk.header.size == 0;
+        if (error != kStatusOK && error != kStatusEndOfFile && !readsNothing)
+            return error;
         if (chunk.next <= chunk.position)
             return kWalkStuck;
         chunk.size = chunk.header.EffectiveSize(header);
@@ -67,21 +71,22 @@ std::int32_t WalkChunks(FileWindow& file, const ContainerChkExtended& header, st
 }
 
 /// Calls `visit(FourCC id, std::int64_t position, std::int64_t size)` for each chunk of a CAF file until it returns
-/// false. A negative size is handed on as it is and ends the walk.
+/// false. A negative size is handed on as it is and ends the walk. 0, or the status of a read that failed.
 template <class Visit>
-void WalkCAFChunks(FileWindow& file, Visit&& visit)
+std::int32_t WalkCAFChunks(FileWindow& file, Visit&& visit)
 {
     constexpr std::int64_t fileHeaderSize = 8;
     std::int64_t position = fileHeaderSize;
     while (position < file.length()) {
         CAFChunkHeader chunk;
-        if (file.read(&chunk, position, sizeof chunk) != kStatusOK)
-            return;
+        if (const std::int32_t status = file.read(&chunk, position, sizeof chunk); status != kStatusOK)
+            return status == kStatusEndOfFile ? std::int32_t{kStatusOK} : status;
         chunk.id.swap();
         chunk.size.swap();
         const std::int64_t size = chunk.size;
         if (!visit(FourCC{chunk.id}, position, size) || size < 0 ||
             __builtin_add_overflow(position + std::int64_t{sizeof chunk}, size, &position))
-            return;
+            break;
     }
+    return kStatusOK;
 }

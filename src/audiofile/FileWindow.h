@@ -19,23 +19,32 @@ public:
     FileWindow(CFileIO& file, std::int64_t length) : file_(file), length_(length) {}
 
     std::int64_t length() const { return length_; }
+    /// Of the first read that did not get what it wanted for another reason than the file's end; kStatusOK until then.
+    /// A file whose bytes cannot be read has not ended.
+    std::int32_t failure() const { return failure_; }
 
-    /// Copies at most `count` bytes, at most those of a piece, and returns their number; 0 on failure.
+    /// Copies at most `count` bytes, at most those of a piece, and returns their number: fewer at the file's end, and
+    /// on a failure.
     std::size_t readSome(void* to, std::int64_t position, std::size_t count)
     {
+        status_ = kStatusEndOfFile;
         if (position < 0 || position >= length_)
             return 0;
         const auto wanted =
             static_cast<std::size_t>(std::min<std::int64_t>(static_cast<std::int64_t>(count), length_ - position));
-        if (position + static_cast<std::int64_t>(wanted) <= std::int64_t{kStartSize})
-            return start_.copy(*this, to, position, wanted, 0);
-        return elsewhere_.copy(*this, to, position, wanted, position);
+        const bool isAtStart = position + static_cast<std::int64_t>(wanted) <= std::int64_t{kStartSize};
+        const std::size_t copied = isAtStart ? start_.copy(*this, to, position, wanted, 0)
+                                             : elsewhere_.copy(*this, to, position, wanted, position);
+        if (copied < wanted && status_ != kStatusEndOfFile && failure_ == kStatusOK)
+            failure_ = status_;
+        return copied;
     }
 
-    /// All of the bytes; kStatusEndOfFile when they are not all there, or are more than a piece.
+    /// All of the bytes; kStatusEndOfFile when they are not all there, or are more than a piece; else the status of the
+    /// read that failed.
     std::int32_t read(void* to, std::int64_t position, std::size_t count)
     {
-        return readSome(to, position, count) == count ? kStatusOK : kStatusEndOfFile;
+        return readSome(to, position, count) == count ? std::int32_t{kStatusOK} : status_;
     }
 
     /// Copies what may be longer than a piece; the number of bytes that were there.
@@ -68,7 +77,9 @@ private:
         {
             long actual = 0;
             const auto there = std::min<std::int64_t>(std::int64_t{Capacity}, window.length_ - from);
-            window.file_.Read(bytes.data(), from, static_cast<long>(there), &actual);
+            const std::int32_t status = window.file_.Read(bytes.data(), from, static_cast<long>(there), &actual);
+            if (status != kStatusOK)
+                window.status_ = status;
             start = from;
             size = static_cast<std::size_t>(std::max(actual, 0L));
         }
@@ -80,6 +91,8 @@ private:
 
     CFileIO& file_;
     std::int64_t length_;
+    std::int32_t status_ = kStatusOK;  // of the last read
+    std::int32_t failure_ = kStatusOK; // the first that lasted
     Piece<kStartSize> start_;
     Piece<kNextSize> elsewhere_;
 };

@@ -225,6 +225,18 @@ std::int32_t CFileIO::GetEOF(long long* length) const
     return kStatusOK;
 }
 
+std::int32_t CFileIO::GetStamp(FileStamp& stamp) const
+{
+    stamp = {};
+    if (IsMemoryFile())
+        return GetEOF(&stamp.length);
+    platform::FileStatus status;
+    if (!platform::systemCalls().status(mDescriptor, &status))
+        return PosixErrorToOSErr();
+    stamp = {status.size, status.changed};
+    return kStatusOK;
+}
+
 std::int32_t CFileIO::SetEOF(long long length)
 {
     if (IsMemoryFile()) {

@@ -15,6 +15,15 @@ enum : unsigned int {
     kFileIOMemory = 0x8000,      // a memory file: the cache block is its content
 };
 
+/// The state of a file: as long as it stays equal the bytes are the same, unless they changed again within one tick of
+/// the system's clock.
+struct FileStamp {
+    long long length = 0;
+    long long changed = 0; // when content or attributes changed last, in nanoseconds since 1970
+
+    bool operator==(const FileStamp&) const = default;
+};
+
 /// The base names the open file, its links resolved. Operations return status codes (platform/core/Status.h); a system
 /// error comes back as PosixErrorToOSErr maps it. Owns its descriptor and its write cache, shares its read cache; one
 /// thread at a time.
@@ -30,18 +39,20 @@ public:
     CFileIO& operator=(const CFileIO&) = delete;
     virtual ~CFileIO();
 
+    // What replaces the file is virtual: derived classes know things of the one that is open.
+
     /// The state of a new object: closed, caches dropped, nothing flushed.
-    void Init();
+    virtual void Init();
     /// Opens what `ref` names, an alias file or symbolic link resolved. kStatusFileNotFound for a missing file without
     /// kFileIOReadWrite (with it, the file is created with permissions 0644), kStatusParameterError for a folder,
     /// kStatusNotAFile for a FIFO, socket or device. A memory file ignores `ref` and takes the cache block for its
     /// content. A failed open leaves the object closed.
-    std::int32_t Open(const CFileRef& ref, unsigned int mode);
+    virtual std::int32_t Open(const CFileRef& ref, unsigned int mode);
     std::int32_t OpenRead(const CFileRef& ref, unsigned int mode) { return Open(ref, mode & ~kFileIOReadWrite); }
     std::int32_t OpenReadWrite(const CFileRef& ref, unsigned int mode) { return Open(ref, mode | kFileIOReadWrite); }
     /// Flushes and frees the write cache, closes, resets the base. The cache block is kept. The object is closed
     /// whatever is returned: the failure to flush, else that to close.
-    std::int32_t Close();
+    virtual std::int32_t Close();
 
     /// At a position, through the read cache; `actual` (may be null) receives the bytes delivered, also on failure.
     /// kStatusEndOfFile when the file ends before `count` bytes.
@@ -69,7 +80,10 @@ public:
     long long GetEOF() const;
     std::int32_t GetEOF(long long* length) const;
     /// The length that Open met, which costs nothing; a file that others write may have another by now.
-    long long LengthAtOpen() const { return mLengthAtOpen; }
+    long long LengthAtOpen() const { return mStampAtOpen.length; }
+    const FileStamp& StampAtOpen() const { return mStampAtOpen; }
+    /// The state now, by one call of the system; of a memory file its length.
+    std::int32_t GetStamp(FileStamp& stamp) const;
     /// Cuts the file or extends it with zeros; a mark beyond `length` moves there.
     std::int32_t SetEOF(long long length);
     /// SetEOF, with `preallocate` after asking for `length` bytes of space behind the end of the file, which may fail.
@@ -105,7 +119,7 @@ public:
 private:
     std::int32_t OpenFile(const CFileRef& ref, unsigned int mode);
     std::int32_t OpenStepByStep(const CFileRef& ref, unsigned int mode);
-    void Adopt(int descriptor, long long length, unsigned int mode);
+    void Adopt(int descriptor, const FileStamp& stamp, unsigned int mode);
     void HintAtNoReuse(long long length);
     std::int32_t CloseDescriptor();
     void ForgetPosition();
@@ -134,6 +148,6 @@ private:
     char* mWriteCacheFill = nullptr;
     long long mWriteCacheCapacity = 0;
     unsigned int mMode = 0;
-    long long mLengthAtOpen = 0;
+    FileStamp mStampAtOpen;
     bool mIsHinted = false; // of the open file
 };

@@ -44,12 +44,12 @@ platform::OpenFor AccessOf(unsigned int mode)
 
 CFileIO::CFileIO(const CFileRef& ref, unsigned int mode)
 {
-    Open(ref, mode);
+    CFileIO::Open(ref, mode);
 }
 
 CFileIO::~CFileIO()
 {
-    Close();
+    CFileIO::Close();
 }
 
 void CFileIO::Init()
@@ -65,7 +65,7 @@ std::int32_t CFileIO::Open(const CFileRef& ref, unsigned int mode)
 {
     if (&ref == this) {
         const CFileRef copy(ref);
-        return Open(copy, mode);
+        return CFileIO::Open(copy, mode);
     }
     FlushWCache();
     DeAllocWCache();
@@ -77,7 +77,7 @@ std::int32_t CFileIO::Open(const CFileRef& ref, unsigned int mode)
         if (!mCache)
             mCache = std::make_shared<KTMem>();
         mCacheLength = static_cast<long long>(mCache->size());
-        mLengthAtOpen = mCacheLength;
+        mStampAtOpen = {mCacheLength, 0};
         mMode = mode;
         return kStatusOK;
     }
@@ -98,7 +98,7 @@ std::int32_t CFileIO::OpenFile(const CFileRef& ref, unsigned int mode)
         if (descriptor >= 0) {
             if (!IsAliasFile(descriptor, status)) {
                 CFileRef::operator=(ref);
-                Adopt(descriptor, status.size, mode);
+                Adopt(descriptor, {status.size, status.changed}, mode);
                 return kStatusOK;
             }
             system.close(descriptor);
@@ -128,16 +128,16 @@ std::int32_t CFileIO::OpenStepByStep(const CFileRef& ref, unsigned int mode)
     const int descriptor = platform::systemCalls().openFile(path, AccessOf(mode), &status);
     if (descriptor < 0)
         return PosixErrorToOSErr();
-    Adopt(descriptor, status.size, mode);
+    Adopt(descriptor, {status.size, status.changed}, mode);
     return kStatusOK;
 }
 
-void CFileIO::Adopt(int descriptor, long long length, unsigned int mode)
+void CFileIO::Adopt(int descriptor, const FileStamp& stamp, unsigned int mode)
 {
     mDescriptor = descriptor;
-    mLengthAtOpen = length;
+    mStampAtOpen = stamp;
     mMode = mode;
-    HintAtNoReuse(length);
+    HintAtNoReuse(stamp.length);
 }
 
 std::int32_t CFileIO::Close()
@@ -158,7 +158,7 @@ std::int32_t CFileIO::CloseDescriptor()
         status = PosixErrorToOSErr();
     mDescriptor = -1;
     mMode = 0;
-    mLengthAtOpen = 0;
+    mStampAtOpen = {};
     mIsHinted = false;
     return status;
 }

@@ -16,6 +16,7 @@ struct FileStatus {
     std::int64_t size = 0;
     FileKind kind = FileKind::other;
     std::uint32_t permissions = 0; // the low 12 mode bits
+    std::int64_t changed = 0;      // when content or attributes changed last, in nanoseconds since 1970
 };
 
 enum class OpenFor { reading, readingAndWriting };

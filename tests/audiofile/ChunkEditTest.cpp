@@ -259,6 +259,51 @@ TEST(ChunkEdit, FailuresSayWhatWasNotWritten)
     EXPECT_EQ(file.RemoveChunk(fourCC("note")), kStatusNotOpen);
 }
 
+TEST(ChunkEdit, NothingOfAFileIsKnownWhenAnotherIsOpen)
+{
+    const TemporaryFolder folder;
+    const CFileRef one((folder / "one.wav").c_str(), false);
+    const CFileRef two(folder.write("two.aif", aiff().bytes()).c_str(), false);
+    const float sample = 0.5;
+    const struct {
+        const char* what;
+        void (*open)(CFileIO& file, const CFileRef& other);
+    } roads[] = {
+        {"OpenReadWrite", [](CFileIO& file, const CFileRef& other) { file.OpenReadWrite(other, 0); }},
+        {"OpenRead", [](CFileIO& file, const CFileRef& other) { file.OpenRead(other, 0); }},
+        {"Open", [](CFileIO& file, const CFileRef& other) { file.Open(other, kFileIOReadWrite); }},
+        {"Init", [](CFileIO& file, const CFileRef& other) { file.Init(), file.CFileIO::Open(other, 1); }},
+        {"Close", [](CFileIO& file, const CFileRef& other) { file.Close(), file.Open(other, 1); }},
+    };
+    for (const auto& road : roads) {
+        SCOPED_TRACE(road.what);
+        CAudioFileIO file;
+        ASSERT_EQ(file.CreateAndOpenCommon(one, 0, kAudioBusMono, 0, 16, 44100, kWAVE, false), kStatusOK);
+        ASSERT_EQ(file.WriteFrames(&sample, 0, 1), kStatusOK);
+        road.open(file, two);
+        EXPECT_TRUE(file.IsOpen());
+        EXPECT_NE(file.Info().fileType, kWAVE);
+        EXPECT_EQ(file.Close(), kStatusOK);
+        EXPECT_EQ(readFile(folder / "two.aif"), aiff().bytes());
+    }
+}
+
+TEST(ChunkEdit, WhatIsStillInTheWriteCacheIsPartOfTheFile)
+{
+    const TemporaryFolder folder;
+    CAudioFileIO file(CFileRef(folder.write("a.wav", wave().bytes()).c_str(), false), kFileIOReadWrite);
+    file.SetWCache(4096);
+    file.SetMark(44);
+    ASSERT_EQ(file.Write("5678", 4), kStatusOK);
+    EXPECT_EQ(add(file, "note", "12"), 1);
+    EXPECT_EQ(readFile(folder / "a.wav"),
+              ContainerBuilder("RIFF").format().chunk("data", "5678").chunk("note", "12").bytes());
+    file.SetMark(44);
+    ASSERT_EQ(file.Write("abcd", 4), kStatusOK);
+    EXPECT_EQ(file.RemoveChunk(fourCC("note")), 0);
+    EXPECT_EQ(readFile(folder / "a.wav"), ContainerBuilder("RIFF").format().chunk("data", "abcd").bytes());
+}
+
 TEST(ChunkEdit, TheHeaderFollowsTheSamples)
 {
     const TemporaryFolder folder;

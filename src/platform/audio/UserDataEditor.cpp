@@ -29,7 +29,7 @@ std::int32_t UserDataEditor::replace(std::size_t chunk, BytesView body)
         if (const std::int32_t status = trimEnd(); status != kStatusOK)
             return status;
     const Piece piece{old.id, body.size(), body};
-    if (const auto status = placeInFrontOf(chunk, piece))
+    if (const auto status = placeInFrontOf(chunk, {piece}))
         return finish(*status);
     if (const auto status = placeBehind(chunk, piece))
         return finish(*status);
@@ -43,7 +43,7 @@ std::int32_t UserDataEditor::replace(std::size_t chunk, BytesView body)
 
 std::int32_t UserDataEditor::append(FourCC id, BytesView body)
 {
-    return body.size() > layout_.largestChunk() ? kStatusFileTooBig : finish(appendPiece({id, body.size(), body}));
+    return body.size() > layout_.largestChunk() ? kStatusFileTooBig : finish(appendContent({{id, body.size(), body}}));
 }
 
 std::int32_t UserDataEditor::remove(std::size_t chunk)
@@ -126,10 +126,10 @@ std::optional<UserDataEditor::Content> UserDataEditor::everythingFrom(std::size_
 
 /// Into filler that stands ahead of a chunk, together with the chunks between them; the rest, through the chunk that
 /// becomes hidden, becomes filler.
-std::optional<std::int32_t> UserDataEditor::placeInFrontOf(std::size_t hidden, const Piece& piece)
+std::optional<std::int32_t> UserDataEditor::placeInFrontOf(std::size_t hidden, const Content& content)
 {
     const std::uint64_t hiddenEnd = hidden < layout_.chunks.size() ? runAround(hidden).end : layout_.end;
-    Content backwards{piece};
+    Content backwards(content.rbegin(), content.rend());
     std::uint64_t copied = 0;
     for (std::size_t i = hidden; i-- > 1;) {
         if (isFiller(i)) {
@@ -170,13 +170,13 @@ std::optional<std::int32_t> UserDataEditor::placeBehind(std::size_t hidden, cons
 }
 
 /// Into filler between two places of the list, where nothing is hidden for it.
-std::optional<std::int32_t> UserDataEditor::placeBetween(std::size_t first, std::size_t past, const Piece& piece)
+std::optional<std::int32_t> UserDataEditor::placeBetween(std::size_t first, std::size_t past, const Content& content)
 {
     for (std::size_t i = first; i < past; ++i) {
         if (!isFiller(i))
             continue;
         const Run filler = runAround(i);
-        if (const auto status = fillFront(filler, filler.end, {piece}))
+        if (const auto status = fillFront(filler, filler.end, content))
             return status;
         i = filler.past - 1;
     }
@@ -267,62 +267,83 @@ std::optional<std::int32_t> UserDataEditor::fillBehind(std::uint64_t hiddenFrom,
 }
 
 /// For a chunk that the samples hold apart from all room: the new one first, then the old one becomes filler. Between
-/// the two both are there, the old one first.
+/// the two both are there, the old one first. Others of its type for which there is no room behind the new one either
+/// are copied along, so that every item keeps its index.
 std::int32_t UserDataEditor::replaceByTwoSteps(std::size_t chunk, const Piece& piece)
 {
-    const auto begin = layout_.chunks.begin();
-    const auto following = [&](auto from) {
-        return std::find_if(from, layout_.chunks.end(), [&](const Chunk& other) { return other.id == piece.id; });
-    };
-    const auto next = static_cast<std::size_t>(following(begin + static_cast<std::ptrdiff_t>(chunk) + 1) - begin);
+    Content content{piece};
+    std::vector<std::size_t> old{chunk};
     std::optional<std::int32_t> status;
-    bool isNext = true; // the new one becomes the next of its type
-    if (next < layout_.chunks.size()) {
-        status = placeBetween(chunk + 1, next, piece);
-        if (auto content = everythingFrom(next); !status && content) {
-            content->insert(content->begin(), piece);
-            status = placeAtEnd(next, *content);
+    while (!status) {
+        const std::size_t next = nextOfType(old.back() + 1, piece.id);
+        if (next == layout_.chunks.size()) {
+            status = appendContent(content);
+        } else if (status = placeBetween(old.back() + 1, next, content); !status) {
+            if (auto moved = everythingFrom(next)) {
+                moved->insert(moved->begin(), content.begin(), content.end());
+                status = placeAtEnd(next, *moved);
+            }
+            if (!status) {
+                content.push_back(pieceOf(next));
+                old.push_back(next);
+            }
         }
-        isNext = status.has_value();
     }
-    if (!status)
-        status = appendPiece(piece);
     if (*status != kStatusOK)
         return *status;
 
-    // The old one stands ahead of all that changed, so that its place in the list is the same.
-    if (*status = rescan(); *status == kStatusOK)
-        *status = file_.flush();
-    if (*status == kStatusOK)
-        *status = hide(chunk);
-    if (*status == kStatusOK || rescan() != kStatusOK)
-        return *status;
-    for (std::size_t i = isNext ? chunk + 1 : layout_.chunks.size() - 1; i < layout_.chunks.size(); isNext ? ++i : --i)
-        if (layout_.chunks[i].id == piece.id) {
-            hide(i);
-            break;
-        }
-    return *status;
+    // The old ones stand ahead of all that changed, so that their places in the list are the same.
+    if (const std::int32_t scanned = rescan(); scanned != kStatusOK)
+        return scanned;
+    return hideOld(old, piece.id);
 }
 
-std::int32_t UserDataEditor::appendPiece(const Piece& piece)
+/// The last one first: until the end the first one is the first. What cannot be finished is undone.
+std::int32_t UserDataEditor::hideOld(const std::vector<std::size_t>& old, FourCC id)
+{
+    std::size_t left = old.size();
+    std::int32_t status = file_.flush();
+    while (status == kStatusOK && left > 0) {
+        status = hide(old[left - 1]);
+        left -= status == kStatusOK ? 1 : 0;
+        if (const std::int32_t scanned = rescan(); scanned != kStatusOK)
+            return scanned;
+    }
+    // Of the new ones those go whose old ones are still there.
+    const std::size_t last = left > 0 ? old[left - 1] : 0;
+    for (std::size_t next; left > 0; --left)
+        if (next = nextOfType(last + 1, id);
+            next == layout_.chunks.size() || hide(next) != kStatusOK || rescan() != kStatusOK)
+            break;
+    return status;
+}
+
+std::size_t UserDataEditor::nextOfType(std::size_t from, FourCC id) const
+{
+    while (from < layout_.chunks.size() && layout_.chunks[from].id != id)
+        ++from;
+    return from;
+}
+
+/// Chunks of one type.
+std::int32_t UserDataEditor::appendContent(const Content& content)
 {
     if (const std::int32_t status = trimEnd(); status != kStatusOK)
         return status;
     const std::size_t count = layout_.chunks.size();
     std::size_t behindItsType = count;
-    while (behindItsType > 0 && layout_.chunks[behindItsType - 1].id != piece.id)
+    while (behindItsType > 0 && layout_.chunks[behindItsType - 1].id != content.front().id)
         --behindItsType;
-    if (const auto status = placeBetween(behindItsType, count, piece))
+    if (const auto status = placeBetween(behindItsType, count, content))
         return *status;
     // Moving the last chunks into filler ahead of them keeps a file from growing with every edit.
     if (!layout_.isBroken)
-        if (const auto status = placeInFrontOf(count, piece))
+        if (const auto status = placeInFrontOf(count, content))
             return *status;
-    if (const std::int32_t status = grow(layout_.extentOf(piece.size)); status != kStatusOK)
+    if (const std::int32_t status = grow(extentOf(content)); status != kStatusOK)
         return status;
     const Run filler = run(count, count + 1);
-    return *fillFront(filler, filler.end, {piece});
+    return *fillFront(filler, filler.end, content);
 }
 
 /// Makes filler of a chunk, and one filler of it and its neighbours.

@@ -54,15 +54,17 @@ private:
     std::optional<Content> everythingFrom(std::size_t chunk) const;
 
     // Each is nullopt when there is no room that way, and nothing was changed.
-    std::optional<std::int32_t> placeInFrontOf(std::size_t hidden, const Piece& piece);
+    std::optional<std::int32_t> placeInFrontOf(std::size_t hidden, const Content& content);
     std::optional<std::int32_t> placeBehind(std::size_t hidden, const Piece& piece);
-    std::optional<std::int32_t> placeBetween(std::size_t first, std::size_t past, const Piece& piece);
+    std::optional<std::int32_t> placeBetween(std::size_t first, std::size_t past, const Content& content);
     std::optional<std::int32_t> placeAtEnd(std::size_t hiddenFrom, const Content& content);
     std::optional<std::int32_t> fillFront(const Run& filler, std::uint64_t hiddenEnd, const Content& content);
     std::optional<std::int32_t> fillBehind(std::uint64_t hiddenFrom, const Run& filler, const Content& content);
 
     std::int32_t replaceByTwoSteps(std::size_t chunk, const Piece& piece);
-    std::int32_t appendPiece(const Piece& piece);
+    std::int32_t hideOld(const std::vector<std::size_t>& old, FourCC id);
+    std::size_t nextOfType(std::size_t from, FourCC id) const;
+    std::int32_t appendContent(const Content& content);
     std::int32_t hide(std::size_t chunk);
     std::int32_t grow(std::uint64_t extent);
     std::int32_t mergeFiller(const Run& filler);

@@ -50,6 +50,7 @@ FileStatus fileStatus(const struct stat& from)
                   : S_ISLNK(from.st_mode) ? FileKind::symbolicLink
                                           : FileKind::other;
     status.permissions = from.st_mode & 07777;
+    status.changed = std::int64_t{from.st_ctim.tv_sec} * 1'000'000'000 + from.st_ctim.tv_nsec;
     return status;
 }
 

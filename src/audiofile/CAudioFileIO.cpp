@@ -8,6 +8,7 @@
 #include "platform/ConvertingReader.h"
 #include "platform/SystemCalls.h"
 
+#include <algorithm>
 #include <array>
 #include <cstdint>
 #include <cstdio>
@@ -174,11 +175,42 @@ std::int32_t CAudioFileIO::UpdateHeader()
     return kStatusOK;
 }
 
+/// Whether the header on disk is one of ours, which may be built anew: then the option is the one that it was built
+/// with. Others hold what a new one would lose, or are shorter, so that it would go over the samples. One that was
+/// never filled in counts no frames.
+bool CAudioFileIO::HasBuiltHeader()
+{
+    Header built;
+    Header stored;
+    for (const bool option : {mHeaderOption, !mHeaderOption}) {
+        for (const std::int64_t frames : {mInfo.frames, std::int64_t{0}}) {
+            const long size = buildHeader(built, mInfo, frames, mSampleFormat, option);
+            if (size <= 0 || size != mInfo.dataOffset || Read(stored.data(), 0, size, nullptr) != kStatusOK)
+                continue;
+            // Chunks behind the samples are counted in the container's size, and in the reservation for it.
+            if (mInfo.fileType != kCaff)
+                std::copy_n(stored.begin() + 4, 4, built.begin() + 4);
+            if (mInfo.fileType == kWAVE && option)
+                std::copy_n(stored.begin() + 20, 8, built.begin() + 20);
+            if (std::equal(built.begin(), built.begin() + size, stored.begin())) {
+                mHeaderOption = option;
+                return true;
+            }
+        }
+    }
+    return false;
+}
+
 std::int32_t CAudioFileIO::SetNumFrames(long frames)
 {
+    if (const std::int32_t status = FlushWCache(); status != kStatusOK)
+        return status;
+    // Building no header, or another one than that which is there, would lose what the file holds.
+    if (!mHeaderDirty && !HasBuiltHeader())
+        return kStatusParameterError;
     Header header;
     const long length = buildHeader(header, mInfo, frames, mSampleFormat, mHeaderOption);
-    if (length <= 0) // cutting the file all the same would lose what it holds
+    if (length <= 0)
         return kStatusParameterError;
     const std::int64_t dataSize = std::int64_t{frames} * mInfo.channels * (mInfo.bitsPerSample / 8);
     std::int32_t status = Write(header.data(), 0, length);
@@ -190,6 +222,7 @@ std::int32_t CAudioFileIO::SetNumFrames(long frames)
     mInfo.frames = frames;
     mInfo.dataSize = dataSize;
     mInfo.fileLength = length + dataSize;
+    mHeaderDirty = (dataSize & 1) != 0; // Kept: the file is as long as its samples until UpdateHeader pads it
     return kStatusOK;
 }
 

@@ -88,6 +88,12 @@ public:
     std::int32_t AddChunk(unsigned int id, const void* data, long size, bool replace);
     std::int32_t AddChunk(const CChunkData& chunk, bool replace);
     std::int32_t AddChunk(unsigned int id, BytesView data, bool replace);
+    /// Makes the container's end fit for one more chunk, where that costs nothing: supplies a missing last pad byte,
+    /// cuts off stray bytes that are fewer than a chunk header, and gives an open-ended CAF "data" its size. 0 when
+    /// AddChunk will then put a chunk where it is found and harm nothing; kStatusParameterError, the file untouched,
+    /// when more than that stands behind the last chunk, or when a CAF file's last chunk claims more than is there;
+    /// else as ForEachChunk, or a status of reading or writing.
+    std::int32_t PrepareToAppend();
     /// Removes every chunk of that id (in CAF the first): one ahead of the samples is renamed "free", others are cut
     /// out.
     std::int32_t RemoveChunk(unsigned int id);
@@ -99,7 +105,9 @@ public:
 
     /// Rewrites the header from the description when samples were written.
     std::int32_t UpdateHeader();
-    /// Rewrites the header for a number of frames and sets the file's length to match.
+    /// Rewrites the header for a number of frames and sets the file's length to match; what stands behind the samples
+    /// is cut off. The pad byte of an odd length comes with UpdateHeader, AddChunk or Close. kStatusParameterError, and
+    /// the file as it was, when the header is not one that BuildAudioFileHeader makes.
     std::int32_t SetNumFrames(long frames);
 
     /// Makes ready to read compressed data, and puts into the description the rate, the channels and the number of
@@ -156,6 +164,7 @@ public:
 private:
     bool IsOpenCAF() const { return mInfo.fileType == kCaff; }
     std::int32_t ReadCompressedFrames(float* to, long long frame, long count, long& delivered);
+    bool HasBuiltHeader();
     std::int32_t PrepareToWrite(long long frame, long count);
     void FramesWritten(long long frames);
     /// Where a chunk stands.
@@ -171,6 +180,7 @@ private:
     std::int32_t Find(FourCC id, FoundChunk& found);
     FileWindow& Window(std::optional<FileWindow>& own);
     std::int32_t PrepareToEdit();
+    std::int32_t SettleOpenEnd(const ChunkEntry& data);
     void ForgetFile();
     std::int32_t ReadBytes(void* to, const FoundChunk& found);
     std::int32_t ReadBody(const FoundChunk& found, std::unique_ptr<char[]>& data);

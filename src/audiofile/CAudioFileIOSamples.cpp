@@ -1,12 +1,10 @@
 // Sample access of CAudioFileIO: in pieces, so that a file of any size costs the same memory.
 #include "audiofile/CAudioFileIO.h"
 
-#include "audiofile/AudioFileHeader.h"
 #include "audiofile/AudioFileLimits.h"
 
 #include <algorithm>
 #include <array>
-#include <cstring>
 
 namespace {
 
@@ -16,30 +14,6 @@ using Piece = std::array<std::byte, kPieceSize>;
 std::size_t samplesInPiece(platform::SampleFormat format)
 {
     return kPieceSize / static_cast<std::size_t>(format.bytesPerSample());
-}
-
-long buildHeader(void* buffer, const AudioFileInfo& info, int sampleFormat, bool option)
-{
-    return BuildAudioFileHeader(buffer, info.fileType, info.frames, info.sampleRate, info.channels, sampleFormat,
-                                info.busFormat, option);
-}
-
-// Whether the header on disk is one of ours, which may be built anew: then `option` receives the option that it was
-// built with. Others hold what a new one would lose.
-bool hasBuiltHeader(CFileIO& file, const AudioFileInfo& info, int sampleFormat, bool& option)
-{
-    std::array<std::byte, kMaxAudioFileHeaderSize> built;
-    std::array<std::byte, kMaxAudioFileHeaderSize> stored;
-    for (const bool candidate : {option, !option}) {
-        const long size = buildHeader(built.data(), info, sampleFormat, candidate);
-        if (size <= 0 || size != info.dataOffset || file.Read(stored.data(), 0, size, nullptr) != kStatusOK)
-            continue;
-        if (std::memcmp(built.data(), stored.data(), static_cast<std::size_t>(size)) == 0) {
-            option = candidate;
-            return true;
-        }
-    }
-    return false;
 }
 
 // Whether something other than a pad byte lies behind the sample data.
@@ -125,7 +99,7 @@ std::int32_t CAudioFileIO::PrepareToWrite(long long frame, long count)
         return kStatusOK;
     if (frame > capacity || count > capacity - frame)
         return kStatusFileTooBig;
-    if (!mHeaderDirty && !hasBuiltHeader(*this, mInfo, mSampleFormat, mHeaderOption))
+    if (!mHeaderDirty && !HasBuiltHeader())
         return kStatusParameterError;
     const long long end = mInfo.dataOffset + (frame + count) * mInfo.bytesPerFrame;
     if (end > MaxAudioFileSize(mInfo.fileType, mHeaderOption))

@@ -4,8 +4,10 @@
 #include "files/CFileUtil.h"
 
 #include <algorithm>
+#include <array>
 #include <cstdlib>
 #include <memory>
+#include <string_view>
 
 namespace {
 
@@ -18,8 +20,32 @@ constexpr unsigned char kReading = 1;
 CFileRef sidecarOf(const CFileRef& file, const char* extension)
 {
     CFileRef sidecar = file;
-    sidecar.ReplaceExtensionBy(extension != nullptr ? extension : "");
+    sidecar.ReplaceExtensionBy(extension);
     return sidecar == file ? CFileRef::None : sidecar;
+}
+
+/// None without an extension, and none when it would be the metadata sidecar, with all the chunks that are in there.
+CFileRef rawSidecarOf(const CFileRef& file, const char* extension)
+{
+    if (extension == nullptr)
+        return CFileRef::None;
+    CFileRef sidecar = sidecarOf(file, extension);
+    return sidecar == sidecarOf(file, kMetadataExtension) ? CFileRef::None : sidecar;
+}
+
+/// What a creation left that was interrupted: the start of a container, shorter than its headers.
+bool isUnfinished(const CFileRef& sidecar)
+{
+    CFileIO file;
+    std::array<char, ContainerChkExtended::kHeadersSize> start{};
+    long length = start.size();
+    if (file.OpenRead(sidecar, 0) != kStatusOK || file.GetEOF() >= static_cast<long long>(start.size()))
+        return false;
+    const std::int32_t status = file.Read(start.data(), &length);
+    constexpr std::string_view id = "FORM";
+    const auto compared = std::min(static_cast<std::size_t>(length), id.size());
+    return (status == kStatusOK || status == kStatusEndOfFile) &&
+           std::string_view(start.data(), compared) == id.substr(0, compared);
 }
 
 bool takesChunks(CAudioFileIO& file)
@@ -51,7 +77,7 @@ std::int32_t writeRawSidecar(const CFileRef& sidecar, const char* data, long siz
 std::int32_t openMetadataSidecar(CAudioFileIO& out, const CFileRef& sidecar)
 {
     constexpr long cacheSize = 100; // KiB
-    if (sidecar.IsFile())
+    if (sidecar.IsFile() && !isUnfinished(sidecar))
         return out.Open(sidecar, kFileIOReadWrite);
     return out.CreateAndOpenCommon(sidecar, cacheSize, kAudioBusMono, 0, 16, 44100, kAIFF, true);
 }
@@ -88,7 +114,9 @@ std::int32_t CFileUtilAddData(const CFileRef& file, const CChunkData& chunk, con
 {
     if (!file.IsFile())
         return kStatusFileNotFound;
-    const CFileRef rawSidecar = sidecarOf(file, extension);
+    if (chunk.size < 0 || (chunk.data == nullptr && chunk.size > 0))
+        return kStatusParameterError;
+    const CFileRef rawSidecar = rawSidecarOf(file, extension);
     const bool hadRawSidecar = rawSidecar.IsFile();
     CFileUtilRemoveData(file, chunk, extension);
     CAudioFileIO target(file, kFileIOReadWrite);
@@ -99,6 +127,8 @@ std::int32_t CFileUtilAddData(const CFileRef& file, const CChunkData& chunk, con
     const auto copy = std::make_unique<char[]>(static_cast<std::size_t>(size));
     std::copy_n(chunk.data.get(), size, copy.get());
     transform(copy.get(), size, kWriting);
+    if (target.IsOpen() && target.InfoStatus() == kStatusIOError) // what it is, nobody knows
+        return kStatusIOError;
     if (takesChunks(target))
         return statusOfAdding(target.AddChunk(chunk.id, copy.get(), size, true), kStatusOK);
     target.Close();
@@ -108,6 +138,8 @@ std::int32_t CFileUtilAddData(const CFileRef& file, const CChunkData& chunk, con
     const std::int32_t opened = openMetadataSidecar(metadata, sidecarOf(file, kMetadataExtension));
     if (opened != kStatusOK)
         return opened;
+    if (!takesChunks(metadata)) // AddChunk, which removes first, would fail in a way that is not reported
+        return kStatusIOError;
     return statusOfAdding(metadata.AddChunk(chunk.id, copy.get(), size, true), raw);
 }
 
@@ -125,7 +157,7 @@ std::int32_t CFileUtilReadData(const CFileRef& file, CChunkData& chunk, const ch
         else if (readMetadataSidecar(metadata, chunk, transform))
             return kStatusOK;
     }
-    if (const CFileRef sidecar = sidecarOf(file, extension); sidecar.IsFile()) {
+    if (const CFileRef sidecar = rawSidecarOf(file, extension); sidecar.IsFile()) {
         CAudioFileIO in(sidecar, 0);
         if (readFrom(in, chunk, transform) == kStatusOK)
             return kStatusOK;
@@ -135,7 +167,7 @@ std::int32_t CFileUtilReadData(const CFileRef& file, CChunkData& chunk, const ch
 
 std::int32_t CFileUtilRemoveData(const CFileRef& file, const CChunkData& chunk, const char* extension)
 {
-    const CFileRef sidecar = sidecarOf(file, extension);
+    const CFileRef sidecar = rawSidecarOf(file, extension);
     std::int32_t status = sidecar.IsFile() ? CFileUtilDelete(sidecar) : kStatusOK;
     CAudioFileIO first(file, kFileIOReadWrite);
     if (first.IsOpen())

@@ -2,7 +2,8 @@
 //
 // There are two sidecars. The raw one is the file's name with the extension that the caller gives, and its content is
 // the chunk's bytes. The metadata sidecar is the name with the extension "ktmd", an AIFF file without samples that
-// carries chunks. A sidecar whose name is the file's own is none.
+// carries chunks. A sidecar whose name is the file's own is none; nor is a raw one with the name of the metadata
+// sidecar, or without an extension (a null pointer).
 #pragma once
 
 #include "audiofile/CChunkData.h"
@@ -21,7 +22,8 @@ enum : long {
 
 /// Removes every older copy, then stores the chunk, in the metadata sidecar when the file is no container; a raw
 /// sidecar that was there is written anew as well. kStatusFileNotFound without the file; kStatusIOError when what
-/// should take the chunk is no container; else the status of creating or opening a sidecar. Nothing is rolled back.
+/// should take the chunk is no container; kStatusParameterError for a negative size; else the status of creating or
+/// opening a sidecar. Nothing is rolled back.
 ///
 /// Kept: an add that fails inside a container is not reported.
 KT_EXPORT std::int32_t CFileUtilAddData(const CFileRef& file, const CChunkData& chunk, const char* extension,

@@ -11,7 +11,7 @@
 namespace {
 
 constexpr std::uint32_t kSizeElsewhere = 0xFFFFFFFF; // in the "ds64"
-constexpr std::int64_t kSmallestContainer = 4;       // nothing but the form type
+constexpr std::int64_t kLargestFORM = 0x7FFFFFFF;    // sizes are signed
 
 std::int64_t padOf(std::int64_t size)
 {
@@ -75,6 +75,8 @@ std::int32_t ContainerEditor::appendToContainer(FourCC id, BytesView body)
     std::int64_t containerSize = 0;
     if (__builtin_add_overflow(last.insertion, size + padOf(size), &containerSize) ||
         header.SetSize(containerSize) != kStatusOK)
+        return kChunkSizeTooLarge;
+    if (!header.IsWAVE() && containerSize > kLargestFORM) // its size would be clamped, and the chunk not found again
         return kChunkSizeTooLarge;
     if (header.HasValidDs64() && !before.HasValidDs64()) {
         header.dataSize = static_cast<std::uint64_t>(last.dataSize);
@@ -307,7 +309,7 @@ std::int32_t ContainerEditor::shrink(ContainerChkExtended header, const std::vec
         size -= hole.next - hole.position;
     if (holes.front().position == std::int64_t{sizeof(ContainerChk)})
         header.firstChunkId = 0; // another stands there now, which must not be taken for a reservation
-    header.SetSize(std::max(size, kSmallestContainer));
+    header.SetSize(size); // one that was too small all along becomes no size at all: what follows is not hidden by it
     if (before.HasValidDs64() && !header.HasValidDs64()) {
         if (const std::int32_t status = storeSizesOutright(before); status != kStatusOK)
             return status;

@@ -304,6 +304,111 @@ TEST(ChunkEdit, WhatIsStillInTheWriteCacheIsPartOfTheFile)
     EXPECT_EQ(readFile(folder / "a.wav"), ContainerBuilder("RIFF").format().chunk("data", "abcd").bytes());
 }
 
+TEST(ChunkEdit, OnlyAHeaderOfOursIsBuiltAnew)
+{
+    const TemporaryFolder folder;
+    const auto sowt =
+        ContainerBuilder("FORM", "AIFC").chunk("COMM", "\0\1\0\0\0\2\0\20\x40\x0E\xAC\x44\0\0\0\0\0\0sowt\0\0"sv);
+    const struct {
+        const char* what;
+        Bytes content;
+    } foreign[] = {
+        {"24 bits in a plain format",
+         ContainerBuilder("RIFF").chunk("fmt ", waveFormat(1, 1, 44100, 3, 24)).chunk("data", "abcdef").bytes()},
+        {"sowt", ContainerBuilder(sowt).chunk("SSND", "12345678abcd").bytes()},
+        {"LIST ahead of the samples",
+         ContainerBuilder("RIFF").format().chunk("LIST", "text").chunk("data", "1234").bytes()},
+        {"LIST as long as the reservation",
+         ContainerBuilder("RIFF").chunk("LIST", std::string(28, 't')).format().chunk("data", "1234").bytes()},
+    };
+    for (const auto& each : foreign) {
+        SCOPED_TRACE(each.what);
+        CAudioFileIO file(CFileRef(folder.write("a", each.content).c_str(), false), kFileIOReadWrite);
+        EXPECT_EQ(file.SetNumFrames(1), kStatusParameterError);
+        EXPECT_EQ(file.Close(), kStatusOK);
+        EXPECT_EQ(readFile(folder / "a"), each.content);
+    }
+    // Samples behind a header that was never filled in are counted.
+    const CFileRef ref((folder / "new.wav").c_str(), false);
+    CAudioFileIO file;
+    ASSERT_EQ(file.CreateAndOpenCommon(ref, 0, kAudioBusMono, 0, 8, 44100, kWAVE, false), kStatusOK);
+    ASSERT_EQ(file.Write("abcde", 44, 5), kStatusOK);
+    ASSERT_EQ(file.Close(), kStatusOK);
+    ASSERT_EQ(file.Open(ref, kFileIOReadWrite), kStatusOK);
+    EXPECT_EQ(file.SetNumFrames(3), kStatusOK);
+    EXPECT_EQ(file.GetEOF(), 47);
+    EXPECT_EQ(file.Close(), kStatusOK);
+    EXPECT_EQ(readFile(folder / "new.wav").size(), 48u) << "the pad byte";
+}
+
+TEST(ChunkEdit, NoAIFFGrowsPastWhatItsSizeCanSay)
+{
+    constexpr std::int64_t dataSize = 2 * kGiB - 200;
+    const TemporaryFolder folder;
+    const Bytes start = ContainerBuilder("FORM", "AIFF").format(2).chunk("SSND", "", dataSize).bytes(2 * kGiB - 158);
+    const std::string path = sparseFile(folder, start, dataSize + std::int64_t(start.size()));
+    CAudioFileIO file(CFileRef(path.c_str(), false), kFileIOReadWrite);
+    const long long before = file.GetEOF();
+    EXPECT_EQ(add(file, "note", std::string(200, 'n')), -9);
+    EXPECT_EQ(file.GetEOF(), before);
+    EXPECT_EQ(add(file, "note", "fits"), 1);
+    EXPECT_EQ(textOf(file.FindChunk(fourCC("note")).value_or(Bytes())), "fits");
+}
+
+TEST(ChunkEdit, ASizeThatIsNoneHidesNothingAfterARemoval)
+{
+    const Bytes content =
+        ContainerBuilder("FORM", "AIFF").chunk("note", "x").format(2).chunk("SSND", 12).bytes(0x80000010);
+    MemoryAudioFile file(content);
+    EXPECT_EQ(file.RemoveChunk(fourCC("note")), 0);
+    const Bytes removed(contentOf(file).begin(), contentOf(file).end());
+    EXPECT_EQ(add(file, "new ", "y"), kStatusEndOfFile); // refused, not put over the samples
+    EXPECT_EQ(textOf(contentOf(file)), textOf(removed));
+}
+
+TEST(ChunkEdit, TheEndIsPreparedWhereThatCostsNothing)
+{
+    const auto caf = [](std::optional<std::int64_t> size = {}) {
+        return ContainerBuilder("caff").format().chunk("data", "1234abc", size).bytes();
+    };
+    const auto with = [](Bytes image, std::string_view behind) {
+        image.insert(image.end(), bytesOf(behind).begin(), bytesOf(behind).end());
+        return image;
+    };
+    const auto odd = ContainerBuilder("RIFF").format().unpadded("data", "123");
+    const struct {
+        const char* what;
+        Bytes before, after;
+        std::int32_t status = 0;
+    } cases[] = {
+        {"nothing to do", wave().bytes(), wave().bytes()},
+        {"no pad byte", odd.bytes(), with(odd.bytes(), "\0"sv)},
+        {"less than a header", with(wave().bytes(4000), "stray12"), wave().bytes(4000)},
+        {"more than a header", with(wave().bytes(), "stray123"), with(wave().bytes(), "stray123"),
+         kStatusParameterError},
+        {"CAF, to the end", caf(-1), caf()},
+        {"CAF, a pad byte", with(caf(), "\0"sv), caf()},
+        {"CAF, a header", with(caf(), "123456789012"), with(caf(), "123456789012"), kStatusParameterError},
+        {"CAF, unfinished", caf(0), caf(0), kStatusParameterError},
+        {"CAF, cut short", caf(100), caf(100), kStatusParameterError},
+    };
+    for (const auto& each : cases) {
+        SCOPED_TRACE(each.what);
+        MemoryAudioFile file(each.before);
+        EXPECT_EQ(file.PrepareToAppend(), each.status);
+        EXPECT_EQ(textOf(contentOf(file)), textOf(each.after));
+        if (each.status != kStatusOK)
+            continue;
+        EXPECT_EQ(add(file, "note", "x"), 1);
+        ChunkEntry data, note;
+        EXPECT_EQ(file.LocateChunk(kData, data), 1);
+        EXPECT_EQ(file.LocateChunk(fourCC("note"), note), 1);
+        EXPECT_EQ(note.offset, std::ssize(each.after));
+    }
+    MemoryAudioFile reader(wave().bytes(), 0);
+    EXPECT_EQ(reader.PrepareToAppend(), kStatusWritePermission);
+}
+
 TEST(ChunkEdit, TheHeaderFollowsTheSamples)
 {
     const TemporaryFolder folder;

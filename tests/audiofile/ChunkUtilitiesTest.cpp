@@ -149,6 +149,41 @@ TEST(ChunkUtilities, WhatCannotBeDone)
     EXPECT_EQ(readBack(path, nullptr), "-1");
 }
 
+TEST(ChunkUtilities, TheRawSidecarIsNeitherTheMetadataSidecarNorANeighbour)
+{
+    const TemporaryFolder folder;
+    const std::string path = folder.write("song.mp3", "no container");
+    folder.write("song", "a neighbour without extension");
+    ASSERT_EQ(add(path, "abc"), kStatusOK);
+    for (const char* extension : {"ktmd", static_cast<const char*>(nullptr)}) {
+        SCOPED_TRACE(extension != nullptr ? extension : "(null)");
+        EXPECT_EQ(CFileUtilAddData(file(path), chunkOf("xyz", fourCC("note")), extension, 0, shift), kStatusOK);
+        EXPECT_EQ(CFileUtilRemoveData(file(path), chunkOf(""), extension), kStatusOK);
+        EXPECT_EQ(bodyIn(folder / "song.ktmd"), "bcd");
+        EXPECT_EQ(bodyIn(folder / "song.ktmd", fourCC("note")), "yz{");
+        EXPECT_EQ(textOf(readFile(folder / "song")), "a neighbour without extension");
+    }
+    CChunkData negative = chunkOf("");
+    negative.size = -1;
+    EXPECT_EQ(CFileUtilAddData(file(path), negative, "ovw", 0, shift), kStatusParameterError);
+}
+
+TEST(ChunkUtilities, AnInterruptedCreationOfTheSidecarIsDoneAnew)
+{
+    const TemporaryFolder folder;
+    const std::string path = folder.write("song.mp3", "no container");
+    ASSERT_EQ(add(path, "abc"), kStatusOK);
+    const Bytes whole = readFile(folder / "song.ktmd");
+    for (std::ptrdiff_t size = 0; size < 20; ++size) {
+        folder.write("song.ktmd", Bytes(whole.begin(), whole.begin() + size));
+        EXPECT_EQ(add(path, "abc"), kStatusOK) << size;
+        EXPECT_EQ(readFile(folder / "song.ktmd"), whole) << size;
+        folder.write("song.ktmd", std::string(static_cast<std::size_t>(size + 1), 'x')); // somebody's own
+        EXPECT_EQ(add(path, "abc"), kStatusIOError) << size;
+        EXPECT_EQ(readFile(folder / "song.ktmd").size(), static_cast<std::size_t>(size + 1));
+    }
+}
+
 TEST(ChunkUtilities, AFullDiskIsTold)
 {
     const TemporaryFolder folder;

@@ -39,7 +39,7 @@ std::string withoutNotes(const Bytes& content)
     MemoryAudioFile file(content, 0);
     std::string list;
     file.ForEachChunk([&](const ChunkEntry& chunk) {
-        if (chunk.id != fourCC("note"))
+        if (chunk.id != fourCC("note") && chunk.id != kDs64 && chunk.id != kJUNK) // RF64 may become RIFF
             list += fourCCText(chunk.id) + std::to_string(chunk.size) + " " +
                     std::to_string(std::hash<std::string_view>()(textOf(file.FindChunk(chunk.id).value_or(Bytes())))) +
                     "\n";
@@ -113,10 +113,11 @@ TEST(ReadFailure, IsToldByEveryOperationAndCostsNoChunk)
                                              operation.name == std::string_view("find") && result == 0;
                     EXPECT_TRUE(result < 0 || saysNothing) << result;
                     // Not rolled back: a move that stopped, and a removal ahead of an addition.
-                    if (now.size() != before.size())
+                    if (now.size() != before.size()) {
                         EXPECT_EQ(withoutNotes(now), withoutNotes(before));
-                    else if (result == kStatusOK)
+                    } else if (result == kStatusOK) {
                         EXPECT_EQ(now, before);
+                    }
                 }
             }
             EXPECT_GT(calls, 2);

@@ -280,3 +280,40 @@ TEST(CFileServer, SharesCompressedFiles)
         ASSERT_EQ(info.samples[2 * frame + 1], static_cast<float>(frame) + 0.5F);
     }
 }
+
+TEST(CFileServer, AnUpdateTakesNoOtherClientsSamples)
+{
+    const TemporaryFolder folder;
+    fs::create_directory(folder / "new");
+    const CFileRef old = writeMono(folder, "a.wav");
+    const CFileRef replacement = writeMono(folder, "new/a.wav");
+    CFileServer server(10);
+    ASSERT_EQ(server.Register(1, &old), 1u);
+    ASSERT_EQ(server.Register(2, &replacement), 1u);
+    CFileRef updated;
+    EXPECT_EQ(server.UpdateAudioFileInfo(&replacement, updated), std::vector<unsigned int>());
+    EXPECT_EQ(server.GetFileInfoVector(2).size(), 1u);
+    EXPECT_EQ(server.GetFileInfoVector(1).size(), 1u);
+    EXPECT_EQ(server.UnRegister(2), 0u);
+    EXPECT_EQ(server.UpdateAudioFileInfo(&replacement, updated), std::vector<unsigned int>{1});
+}
+
+TEST(CFileServer, ClientsSwapTheirPlaces)
+{
+    const TemporaryFolder folder;
+    const CFileRef both = writeMono(folder, "both.wav"), one = writeMono(folder, "one.wav");
+    CFileServer server(10);
+    ASSERT_EQ(server.Register(1, &one), 1u);
+    ASSERT_EQ(server.Register(1, &both), 1u);
+    ASSERT_EQ(server.Register(2, &both), 2u);
+    server.SwapClients(1, 2);
+    EXPECT_EQ(namesOf(server, 1), Names{"both.wav"});
+    EXPECT_EQ(namesOf(server, 2), (Names{"one.wav", "both.wav"}));
+    server.SwapClients(2, 7); // also with one that is in no file
+    EXPECT_EQ(namesOf(server, 2), Names());
+    EXPECT_EQ(namesOf(server, 7), (Names{"one.wav", "both.wav"}));
+    std::vector<unsigned int> ids{3, 9, 4};
+    EXPECT_EQ(server.MaxClientId(ids), 9u);
+    ids.clear();
+    EXPECT_EQ(server.MaxClientId(ids), 0u);
+}

@@ -184,6 +184,8 @@ std::vector<unsigned int> CFileServer::UpdateAudioFileInfo(const CFileRef* newFi
     if (container == nullptr)
         return {};
     const CFileRef replacement = *newFile; // the caller may pass one reference as both
+    if (const TContainer* holder = Find(&replacement); holder != nullptr && holder != container)
+        return {}; // others read that one's samples
     oldFile = container->ref;
     kTContainerValueCallbacks.retain(container);
     mFiles.remove(oldFile.URL());

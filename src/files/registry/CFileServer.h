@@ -51,7 +51,8 @@ public:
     const std::vector<TFileInfo>& GetFileInfoVector(unsigned int clientId);
     /// Lets the first registered file of the same name (in the same case), sample rate, channels and frames be
     /// `newFile` from now on: `oldFile` becomes the reference that it had, and the ids of its clients are returned.
-    /// None, and nothing changed, when there is no such file. The samples stay as they are.
+    /// None, and nothing changed, when there is no such file, and when another is registered under the new reference.
+    /// The samples stay as they are.
     std::vector<unsigned int> UpdateAudioFileInfo(const CFileRef* newFile, CFileRef& oldFile);
     /// The name of the client's first file, 255 bytes at most; empty when it has none. Kept: in one buffer for the
     /// whole process, which the next call overwrites.

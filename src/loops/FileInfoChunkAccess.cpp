@@ -39,7 +39,9 @@ void FileInfoCafChunkReader::readChunk()
         const auto* text = entry.second.template get<std::string>();
         return text == nullptr || !platform::String::fromUTF8(entry.first) || !platform::String::fromUTF8(*text);
     });
-    if (const auto archive = platform::archiveDictionary(information))
+    // Where the file says none of them the object stays as it is.
+    const auto archive = platform::archiveDictionary(information);
+    if (archive && !Types::fileInfoChunkDataDictionaryFromCafChunkData(*archive).empty())
         chunk_.chunkData().setChunkData(*archive, fourCC("caff"));
 }
 

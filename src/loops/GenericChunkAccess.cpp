@@ -6,8 +6,20 @@
 using UserData = VireoLoopUserDataUtils;
 using UUIDUserData = VireoLoopUUIDUserDataUtils;
 
+namespace {
+
+/// Not in CAF: its id stands for no UUID, and the "uuid" items of others are not its own.
+bool hasNoPlaceInCAF(const VireoLoopBaseChunk& chunk)
+{
+    return chunk.cafChunkID() == tagging::kCAFUUIDChunk && !chunk.cafChunkIsUUIDChunk();
+}
+
+} // namespace
+
 void GenericCafChunkReader::readChunk()
 {
+    if (hasNoPlaceInCAF(chunk_))
+        return;
     const auto data = chunk_.cafChunkIsUUIDChunk() ? UUIDUserData::read(file_, *chunk_.cafChunkUUID())
                                                    : UserData::read(file_, chunk_.cafChunkID(), 0);
     if (data)
@@ -17,7 +29,7 @@ void GenericCafChunkReader::readChunk()
 bool GenericCafChunkWriter::writeChunk()
 {
     const auto data = chunk_.chunkData().chunkDataForAudioFileType(fourCC("caff"));
-    if (!data)
+    if (!data || hasNoPlaceInCAF(chunk_))
         return false;
     return chunk_.cafChunkIsUUIDChunk() ? UUIDUserData::write(file_, *chunk_.cafChunkUUID(), *data)
                                         : UserData::writeFirst(file_, chunk_.cafChunkID(), *data);
@@ -25,6 +37,8 @@ bool GenericCafChunkWriter::writeChunk()
 
 bool GenericCafChunkRemover::removeChunk()
 {
+    if (hasNoPlaceInCAF(chunk_))
+        return true;
     return chunk_.cafChunkIsUUIDChunk() ? UUIDUserData::removeAll(file_, *chunk_.cafChunkUUID())
                                         : UserData::removeAll(file_, chunk_.cafChunkID());
 }

@@ -28,8 +28,8 @@ bool VireoLoopChunksManager::writeChunks(Chunks chunks)
     for (const auto& chunk : chunks) {
         if (!file_ || chunk->chunkData().isEmpty())
             continue;
-        if (const auto writer = chunk->chunkWriter(*file_, audioFileTypeID_))
-            written = writer->writeChunk() && written;
+        const auto writer = chunk->chunkWriter(*file_, audioFileTypeID_);
+        written = writer && writer->writeChunk() && written;
     }
     return written;
 }
@@ -40,8 +40,8 @@ bool VireoLoopChunksManager::removeChunks(Chunks chunks)
     for (const auto& chunk : chunks) {
         if (!file_)
             break;
-        if (const auto remover = chunk->chunkRemover(*file_, audioFileTypeID_))
-            removed = remover->removeChunk() && removed;
+        const auto remover = chunk->chunkRemover(*file_, audioFileTypeID_);
+        removed = remover && remover->removeChunk() && removed;
     }
     return removed;
 }

@@ -27,7 +27,8 @@ public:
 
     /// Fills the data objects of the chunks that the file has; others stay as they are.
     void readChunks(Chunks chunks);
-    /// Empty chunks are skipped, not removed. False when one could not be written; the others still are.
+    /// Empty chunks are skipped, not removed. False when one could not be written, as in files that are neither AIFF
+    /// nor CAF; the others still are.
     bool writeChunks(Chunks chunks);
     bool removeChunks(Chunks chunks);
 

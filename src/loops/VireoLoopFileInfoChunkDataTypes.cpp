@@ -50,13 +50,27 @@ Dictionary rekeyed(const Dictionary& from, const char* FileInfoKey::*fromKey, co
     return to;
 }
 
+/// The size of the white space at an end of a text; 0 for none. Unicode's, in UTF-8, and NUL.
+std::size_t whiteSpaceAt(std::string_view text, bool (std::string_view::*isAt)(std::string_view) const noexcept)
+{
+    using namespace std::string_view_literals;
+    static constexpr std::string_view spaces[] = {
+        " "sv,      "\t"sv,     "\n"sv,     "\v"sv,     "\f"sv,     "\r"sv,     "\0"sv,     "\xC2\x85"sv, "\u00A0"sv,
+        "\u1680"sv, "\u2000"sv, "\u2001"sv, "\u2002"sv, "\u2003"sv, "\u2004"sv, "\u2005"sv, "\u2006"sv,   "\u2007"sv,
+        "\u2008"sv, "\u2009"sv, "\u200A"sv, "\u2028"sv, "\u2029"sv, "\u202F"sv, "\u205F"sv, "\u3000"sv};
+    for (const std::string_view space : spaces)
+        if ((text.*isAt)(space))
+            return space.size();
+    return 0;
+}
+
 std::string_view trimmed(std::string_view text)
 {
-    constexpr std::string_view space(" \t\r\n\v\f\0", 7);
-    const std::size_t begin = text.find_first_not_of(space);
-    if (begin == std::string_view::npos)
-        return {};
-    return text.substr(begin, text.find_last_not_of(space) - begin + 1);
+    while (const std::size_t size = whiteSpaceAt(text, &std::string_view::starts_with))
+        text.remove_prefix(size);
+    while (const std::size_t size = whiteSpaceAt(text, &std::string_view::ends_with))
+        text.remove_suffix(size);
+    return text;
 }
 
 } // namespace

@@ -32,12 +32,10 @@ std::int32_t findBody(CAudioFileIO& file, FourCC id, Body& body)
 {
     const std::int64_t headerSize =
         file.Info().fileType == kCaff ? std::int64_t{sizeof(CAFChunkHeader)} : kChunkHeaderSize;
-    long size = 0;
-    long long position = 0;
-    long long next = 0;
-    const std::int32_t result = file.FindChunk(id, nullptr, &size, &position, &next);
-    body = {position + headerSize, size};
-    if (result == kFound && (size < 0 || size > file.GetEOF() - body.offset))
+    ChunkEntry chunk;
+    const std::int32_t result = file.LocateChunk(id, chunk);
+    body = {chunk.offset + headerSize, chunk.size};
+    if (result == kFound && (chunk.size < 0 || chunk.size > file.GetEOF() - body.offset))
         return kStatusEndOfFile;
     return result;
 }
@@ -70,18 +68,39 @@ bool isSilence(const KTMem& overview)
                        [](OverviewPoint point) { return point.minimum == 0 && point.maximum == 0; });
 }
 
-/// Removing takes out the first only, and the first is the one that is found. One that goes beyond the end of the file
-/// would hide what is put behind it.
-std::int32_t removeCAFOverviews(CAudioFileIO& file)
+std::int32_t countCAFOverviews(CAudioFileIO& file, int& count)
 {
-    for (;;) {
-        Body body;
-        const std::int32_t found = findBody(file, kCAFOverview, body);
-        if (found != kFound)
-            return found;
+    count = 0;
+    return file.ForEachChunk([&](const ChunkEntry& chunk) {
+        count += chunk.id == kCAFOverview && chunk.size > 0 ? 1 : 0;
+        return true;
+    });
+}
+
+/// Removing takes out the first only, and the first is the one that is found: the last `kept` stay.
+std::int32_t removeCAFOverviews(CAudioFileIO& file, int kept)
+{
+    for (int before = -1;;) {
+        int count = 0;
+        if (const std::int32_t status = countCAFOverviews(file, count); status != kStatusOK || count <= kept)
+            return status;
+        if (count == before) // it cannot be removed
+            return kStatusIOError;
+        before = count;
         if (const std::int32_t status = file.RemoveChunk(kCAFOverview); status != kStatusOK)
             return status;
     }
+}
+
+/// Nothing is left of an addition that failed: it would be in the way of the next.
+std::int32_t addCAFOverview(CAudioFileIO& file, const KTMem& chunk)
+{
+    const long long end = file.GetEOF();
+    const std::int32_t added = file.AddChunk(kCAFOverview, BytesView(chunk.data(), chunk.size()), false);
+    if (added == kFound)
+        return kStatusOK;
+    file.SetEOF(end);
+    return added;
 }
 
 std::int32_t writeCAF(CAudioFileIO& file, const KTMem& overview, bool& stored)
@@ -98,17 +117,24 @@ std::int32_t writeCAF(CAudioFileIO& file, const KTMem& overview, bool& stored)
     const bool isSilent = isSilence(overview);
     if (!isSilent && !makeCAFOverview(overview, editCount, chunk))
         return kOutOfMemory;
-    if (const std::int32_t status = removeCAFOverviews(file); status != kStatusOK)
-        return status;
     if (isSilent)
-        return kStatusOK;
-    const std::int32_t added = file.AddChunk(kCAFOverview, BytesView(chunk.data(), chunk.size()), false);
-    stored = added == kFound;
-    return stored ? kStatusOK : added;
+        return removeCAFOverviews(file, 0);
+    Body old;
+    if (const std::int32_t found = findBody(file, kCAFOverview, old); found < 0)
+        return found;
+    if (const std::int32_t status = file.PrepareToAppend(); status != kStatusOK)
+        return status;
+    if (const std::int32_t status = addCAFOverview(file, chunk);
+        status != kStatusOK) // the old one goes when this stands
+        return status;
+    stored = true;
+    return removeCAFOverviews(file, 1);
 }
 
 std::int32_t writeChunked(CAudioFileIO& file, KTMem& overview, bool& stored)
 {
+    if (const std::int32_t status = file.PrepareToAppend(); status != kStatusOK)
+        return status;
     const bool swaps = !isHostOrder(file.Info());
     if (swaps)
         swapHeader(overview);
@@ -222,7 +248,11 @@ std::int32_t readOverview(CAudioFileIO& file, std::int64_t frames, KTMem& block)
     if (file.Info().fileType == kCaff)
         return readCAF(file, frames, block);
     const std::int32_t result = readPlain(file, frames, block);
-    return result == kNotFound ? readOlder(file, frames, block) : result;
+    if (result != kNotFound && result != kStatusParameterError)
+        return result;
+    // One that does not fit does not hide an older one that does.
+    const std::int32_t older = readOlder(file, frames, block);
+    return older == kNotFound ? result : older;
 }
 
 } // namespace

@@ -87,7 +87,10 @@ std::optional<Bytes> CAFBasicUUIDChunkData(const tagging::StringPairs& strings)
 
 std::optional<Bytes> CAFTransientUUIDChunkData(const std::int64_t* positions, std::int64_t count)
 {
+    constexpr std::int64_t most = UINT32_MAX / sizeof(tagging::CAFTransientRecord); // an item's size has 32 bits
     const std::int64_t records = std::max<std::int64_t>(count, 0);
+    if (records > most || (positions == nullptr && records > 0))
+        return std::nullopt;
     return built([&](ByteWriter& writer) {
         writer.reserve(tagging::kUUIDSize + sizeof(tagging::CAFTransientsPayload) +
                        static_cast<std::size_t>(records) * sizeof(tagging::CAFTransientRecord));

@@ -126,6 +126,9 @@ TEST_F(StoredOverview, OlderOnesAreReadToo)
     }
     const std::string newer = hex("2c01000000000000 0001 0002"); // goes first
     EXPECT_EQ(read(fileOf(wave({{"LGWV", fromHex(newer)}, {"ovwf", fromHex(ahead + "40fd7f81")}}))), newer);
+    // One that does not fit hides nothing.
+    EXPECT_EQ(read(fileOf(wave({{"LGWV", Bytes(11)}, {"ovwf", fromHex(ahead + "40fd7f81")}}))),
+              hex("2c01000000000000 fd40817f"));
 }
 
 // CAF pairs of any number of frames, in a file of 300 frames or of as many as the case says.
@@ -214,6 +217,45 @@ TEST_F(StoredOverview, WhatCannotBeStoredLeavesTheFileUntouched)
     const CFileRef missing((folder_ / "missing").c_str(), false);
     EXPECT_EQ(write(missing, &overview_), kMissing);
     EXPECT_FALSE(std::filesystem::exists(missing.GetPath()));
+}
+
+TEST_F(StoredOverview, StrayBytesAtTheEndNeitherHideItNorBecomeSamples)
+{
+    const auto with = [](Bytes image, std::string_view behind) {
+        image.insert(image.end(), bytesOf(behind).begin(), bytesOf(behind).end());
+        return image;
+    };
+    const std::string block = toHex(bytesOf(overview_));
+    const Bytes cleanWave = wave(), cleanCaf = caf();
+    for (const Bytes& image : {with(cleanWave, "1234567"), with(aiff(), "1"), with(cleanCaf, std::string_view("\0", 1)),
+                               with(cleanCaf, "12345678901")}) {
+        const CFileRef ref = fileOf(image);
+        EXPECT_EQ(write(ref, &overview_), "stored");
+        EXPECT_EQ(read(ref), block);
+        const Bytes once = readFile(ref.GetPath());
+        EXPECT_EQ(write(ref, &overview_), "stored");
+        EXPECT_EQ(readFile(ref.GetPath()), once) << "it grows";
+        EXPECT_EQ(CAudioFileIO(ref, 0).Info().frames, kFrames);
+    }
+    for (const Bytes& image : {with(cleanWave, "12345678"), with(cleanCaf, "123456789012")}) {
+        const CFileRef ref = fileOf(image);
+        EXPECT_EQ(write(ref, &overview_), kRefused);
+        EXPECT_EQ(readFile(ref.GetPath()), image);
+    }
+}
+
+TEST_F(StoredOverview, TheOldOneStaysUntilTheNewOneStands)
+{
+    KTMem other = blockOf(kFrames, {{-1, 1}, {-2, 2}});
+    for (const int failing : {1, 2, 3}) {
+        const CFileRef ref = fileOf(caf());
+        ASSERT_EQ(write(ref, &overview_), "stored");
+        const std::string before = read(ref);
+        FaultInjector faults;
+        faults.fail(Call::pwrite, ENOSPC, failing, 100);
+        const std::string result = write(ref, &other);
+        EXPECT_TRUE(read(ref) == before || result == "stored") << failing << result;
+    }
 }
 
 // The status is that of the chunk layer, and the file is closed each time.

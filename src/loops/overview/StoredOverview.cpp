@@ -127,8 +127,9 @@ std::int32_t writeCAF(CAudioFileIO& file, const KTMem& overview, bool& stored)
     if (const std::int32_t status = addCAFOverview(file, chunk);
         status != kStatusOK) // the old one goes when this stands
         return status;
-    stored = true;
-    return removeCAFOverviews(file, 1);
+    const std::int32_t removed = removeCAFOverviews(file, 1); // until then the old one is the one that is found
+    stored = removed == kStatusOK;
+    return removed;
 }
 
 std::int32_t writeChunked(CAudioFileIO& file, KTMem& overview, bool& stored)

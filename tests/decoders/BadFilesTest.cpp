@@ -82,7 +82,8 @@ struct Original {
 const Original originals[] = {
     {"a.mp3", "lame --quiet -V 4 source.wav a.mp3"},   {"a.m4a", "ffmpeg -i source.wav -c:a aac a.m4a"},
     {"a.flac", "ffmpeg -i source.wav a.flac"},         {"a.aac", "ffmpeg -i source.wav -c:a aac -f adts a.aac"},
-    {"a.caf", "ffmpeg -i source.wav -c:a alac a.caf"},
+    {"a.caf", "ffmpeg -i source.wav -c:a alac a.caf"}, {"a.wv", "wavpack -q --blocksize=512 source.wav -o a.wv"},
+    {"a.wav", "sox -D source.wav -e ima-adpcm a.wav"},
 };
 
 std::ostream& operator<<(std::ostream& out, const Original& original)

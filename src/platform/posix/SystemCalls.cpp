@@ -159,8 +159,18 @@ bool needsLookBeforeOpening(const char* path, OpenFor access)
            !endsLikeRecording(path);
 }
 
+/// "/proc/self/fd/N" leads to the file that is open, not to a name that somebody else could have given away: whoever
+/// asks for it by that path means it.
+bool isOwnDescriptor(const char* path)
+{
+    constexpr std::string_view kFolder = "/proc/self/fd/";
+    return std::string_view(path).starts_with(kFolder);
+}
+
 int openFileWithoutLinks(const char* path, OpenFor access, FileStatus* status)
 {
+    if (isOwnDescriptor(path))
+        return openFile(path, access, status);
     if (needsLookBeforeOpening(path, access)) {
         FileStatus found;
         if (!pathStatus(path, &found) || !isRegular(found))

@@ -23,5 +23,6 @@ void requireOK(std::int32_t status)
 
 void reportFailure(const std::string& path, const std::string& text)
 {
-    fmt::print(stderr, "ktfiles: {}: {}\n", printableOnError(path), printableOnError(text));
+    // Not by fmt::print, which throws where standard error cannot be written: the work is not to end for that.
+    std::fputs(fmt::format("ktfiles: {}: {}\n", printableOnError(path), printableOnError(text)).c_str(), stderr);
 }

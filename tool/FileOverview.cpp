@@ -38,9 +38,9 @@ FileOverview FileOverview::computed(const std::string& path, bool quiet)
     overview.info_ = file.Info();
     requireSound(overview.info_);
     if (overview.info_.missingDataSize > 0 && !quiet)
-        fmt::print(stderr,
-                   "ktfiles: {}: ends ahead of its sound, {} bytes of which are missing; what is there is shown\n",
-                   printableOnError(path), overview.info_.missingDataSize);
+        reportFailure(path,
+                      fmt::format("ends ahead of its sound, {} bytes of which are missing; what is there is shown",
+                                  overview.info_.missingDataSize));
     Progress progress("reading", overview.info_.frames, quiet);
     long long done = 0;
     std::int32_t status = kStatusOK;

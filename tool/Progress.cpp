@@ -19,7 +19,7 @@ Progress::Progress(std::string label, std::int64_t total, bool quiet)
 Progress::~Progress()
 {
     if (shown_)
-        fmt::print(stderr, "\r\x1b[K");
+        std::fputs("\r\x1b[K", stderr);
 }
 
 void Progress::advance(std::int64_t bytes)
@@ -38,6 +38,7 @@ void Progress::draw() const
     const int bar = std::clamp(terminalColumns() - displayWidth(label_) - kPercentColumns, 0, 40);
     const double part = static_cast<double>(done_) / static_cast<double>(total_);
     const int full = static_cast<int>(part * bar);
-    fmt::print(stderr, "\r{} {:█<{}}{:░<{}} {:3.0f}%", label_, "", full, "", bar - full, part * 100);
+    std::fputs(fmt::format("\r{} {:█<{}}{:░<{}} {:3.0f}%", label_, "", full, "", bar - full, part * 100).c_str(),
+               stderr);
     std::fflush(stderr);
 }

@@ -26,7 +26,7 @@ void ScanProgress::advance(std::int64_t files)
 void ScanProgress::hide()
 {
     if (std::exchange(shown_, false)) {
-        fmt::print(stderr, "\r\x1b[K");
+        std::fputs("\r\x1b[K", stderr);
         std::fflush(stderr);
         nextDraw_ = Clock::now();
     }
@@ -47,7 +47,7 @@ void ScanProgress::draw(Clock::time_point now)
             static_cast<int>(static_cast<double>(width) * static_cast<double>(done_) / static_cast<double>(total));
         bar = fmt::format("{:█<{}}{:░<{}} ", "", full, "", width - full);
     }
-    fmt::print(stderr, "\rscanning {}{}\x1b[K", bar, text);
+    std::fputs(fmt::format("\rscanning {}{}\x1b[K", bar, text).c_str(), stderr);
     std::fflush(stderr);
     shown_ = true;
 }

@@ -51,7 +51,7 @@ void awaitOthers(const std::string& path, const WaitOptions& options, const std:
 
 void printWaiting(const std::string& path, const std::string& blockers)
 {
-    fmt::print(stderr, "ktfiles: {}: waiting for {} ...\n", printableOnError(path), printableOnError(blockers));
+    reportFailure(path, "waiting for " + blockers + " ...");
 }
 
 std::string stillInUseText(const std::string& blockers, double seconds)

@@ -1,7 +1,7 @@
 // ktfiles chunks add, and remove.
 #include "ChunksCommand.h"
 #include "CommandLine.h"
-#include "EditGuards.h"
+#include "ContainerChanges.h"
 #include "Failure.h"
 #include "InputFile.h"
 #include "SidecarChunks.h"
@@ -11,7 +11,6 @@
 #include <cerrno>
 #include <fcntl.h>
 #include <limits>
-#include <sys/stat.h>
 #include <unistd.h>
 
 namespace {
@@ -25,41 +24,6 @@ struct EditArguments {
     std::string sidecar; // the extension; empty: only the container itself
     EditOptions options;
 };
-
-std::string addStatusText(std::int32_t status)
-{
-    switch (status) {
-    case 0:
-        return "the file is not chunk-based";
-    case -2:
-        return "its container header cannot be read";
-    case -3:
-        return "the new chunk's header cannot be written";
-    case -4:
-        return "the new chunk's body cannot be written";
-    case -5:
-        return "its container header cannot be written";
-    case -6:
-        return "is not open for writing";
-    case -7:
-        return "the chunk to replace cannot be removed";
-    case -8:
-        return "its chunks cannot be walked";
-    case -9:
-        return "the chunk is too large for the container";
-    case kStatusEndOfFile:
-        return "its container has a negative size";
-    default:
-        return StatusText(status);
-    }
-}
-
-// The container's codes say which step failed; the system's last error often says why.
-[[noreturn]] void failToAdd(std::int32_t status, int systemError)
-{
-    const bool writing = status <= -3 && status >= -5;
-    throw Failure(addStatusText(status) + (writing && systemError != 0 ? ": " + systemErrorText(systemError) : ""));
-}
 
 Bytes readAll(const std::string& from)
 {
@@ -92,56 +56,6 @@ void refuseUnlessForced(const std::optional<std::string>& objection, bool force)
 {
     if (objection && !force)
         throw Failure(*objection + "; --force does it all the same");
-}
-
-void refuseBackup(const EditArguments& arguments)
-{
-    if (arguments.options.backup)
-        throw Failure("keeps its chunks beside it and is not changed: there is nothing to back up");
-}
-
-ChunkSurvey survey(const std::string& path, FourCC id)
-{
-    CAudioFileIO file;
-    openContainer(file, path, 0);
-    return surveyChunks(file, id);
-}
-
-void removeFrom(const std::string& path, FourCC id)
-{
-    // The library removes one chunk at a time from a CAF file, and all at once from others.
-    for (std::int64_t left = survey(path, id).count; left > 0;) {
-        CAudioFileIO file;
-        openContainer(file, path, kFileIOReadWrite);
-        requireOK(file.RemoveChunk(id));
-        requireOK(file.Close());
-        const std::int64_t now = survey(path, id).count;
-        if (now >= left)
-            throw Failure("the chunk \"" + fourCCText(id) + "\" cannot be removed: its body cannot be read");
-        left = now;
-    }
-}
-
-void addTo(const std::string& path, const EditArguments& arguments, const Bytes& body)
-{
-    if (arguments.replace) // not left to AddChunk, which removes only the first of them from a CAF file
-        removeFrom(path, arguments.id);
-    CAudioFileIO file;
-    openContainer(file, path, kFileIOReadWrite);
-    const std::int64_t before = surveyChunks(file, arguments.id).count;
-    settleOpenEndedData(file);
-    const std::int64_t length = file.GetEOF();
-    errno = 0;
-    const std::int32_t status = file.AddChunk(arguments.id, body, false);
-    if (status != 1)
-        failToAdd(status, errno);
-    requireOK(file.Close());
-    const ChunkSurvey after = survey(path, arguments.id);
-    if (after.count != before + 1 || after.last->id != arguments.id ||
-        after.last->size != static_cast<std::int64_t>(body.size()))
-        throw Failure("the chunk is not found as it should be after the edit");
-    if (after.last->offset < length && !arguments.force)
-        throw Failure("the chunk was not put behind all that is there");
 }
 
 struct EditReport {
@@ -183,41 +97,89 @@ void print(const EditArguments& arguments, const OutputOptions& output, const Ed
     }
 }
 
-// With a sidecar every older copy goes, so that a container's own must be one that may.
-void addAnywhereOrRefuse(const EditArguments& arguments, const OutputOptions& output, const Bytes& body)
+// What --force overrules is told ahead; a file so damaged cannot be compared afterwards.
+EditScope scopeOf(const EditArguments& arguments, const std::optional<std::string>& objection)
+{
+    refuseUnlessForced(objection, arguments.force);
+    return objection ? EditScope::wholeFile() : EditScope::chunk(arguments.id);
+}
+
+EditReport addToContainer(const EditArguments& arguments, const Bytes& body)
 {
     SafeEdit edit(arguments.file, arguments.options);
-    const bool inFile = keepsItsChunks(edit.target());
-    if (!inFile)
-        refuseBackup(arguments);
     EditReport report{"add", 1, std::ssize(body)};
-    if (inFile) {
+    std::optional<std::string> objection;
+    {
         CAudioFileIO file;
         openContainer(file, edit.target(), 0);
         const ChunkSurvey found = surveyChunks(file, arguments.id);
-        refuseUnlessForced(objectionToAdding(file, found, arguments.id, report.size), arguments.force);
-        report.replaced = found.count;
+        objection = objectionToAdding(file, found, arguments.id, report.size);
+        report.replaced = arguments.replace ? found.count : 0;
     }
-    SidecarEdit done = addAnywhere(edit, arguments.id, body, arguments.sidecar, arguments.options.dryRun);
-    report.backup = done.backup;
-    if (!inFile)
-        report.where = done.where;
-    print(arguments, output, report);
+    const EditScope scope = scopeOf(arguments, objection);
+    if (!arguments.options.dryRun)
+        report.backup = edit.apply(scope, [&](const std::string& path) {
+            addChunkTo(path, {arguments.id, body, arguments.replace, arguments.force});
+        });
+    return report;
 }
 
-void removeEverywhereOrRefuse(const EditArguments& arguments, const OutputOptions& output)
+EditReport removeFromContainer(const EditArguments& arguments)
 {
     SafeEdit edit(arguments.file, arguments.options);
-    if (keepsItsChunks(edit.target()))
-        refuseUnlessForced(objectionToRemoving(survey(edit.target(), arguments.id), arguments.id), arguments.force);
-    else
+    const ChunkSurvey found = surveyOf(edit.target(), arguments.id);
+    if (found.count == 0)
+        throw Failure("has no chunk \"" + fourCCText(arguments.id) + "\"");
+    const EditScope scope = scopeOf(arguments, objectionToRemoving(found, arguments.id));
+    EditReport report{"remove", found.count, found.total};
+    if (!arguments.options.dryRun)
+        report.backup =
+            edit.apply(scope, [&](const std::string& path) { removeChunksFrom(path, arguments.id, found.count); });
+    return report;
+}
+
+void refuseBackup(const EditArguments& arguments)
+{
+    if (arguments.options.backup)
+        throw Failure("keeps its chunks beside it and is not changed: there is nothing to back up");
+}
+
+// With a sidecar every older copy goes.
+EditReport addAnywhere(EditArguments arguments, const Bytes& body)
+{
+    Sidecars sidecars(arguments.file, arguments.sidecar, arguments.options);
+    refuseUnlessForced(sidecars.objection(), arguments.force);
+    if (keepsItsChunks(sidecars.file())) {
+        arguments.replace = true;
+        const EditReport report = addToContainer(arguments, body);
+        sidecars.removeRaw();
+        return report;
+    }
+    refuseBackup(arguments);
+    EditReport report{"add", 1, std::ssize(body)};
+    report.where = sidecars.add(arguments.id, body, arguments.force);
+    return report;
+}
+
+EditReport removeEverywhere(const EditArguments& arguments)
+{
+    Sidecars sidecars(arguments.file, arguments.sidecar, arguments.options);
+    refuseUnlessForced(sidecars.objection(), arguments.force);
+    const bool inFile = keepsItsChunks(sidecars.file());
+    if (!inFile)
         refuseBackup(arguments);
+    const std::int64_t count = inFile ? surveyOf(sidecars.file(), arguments.id).count : 0;
     EditReport report{"remove", 0, -1};
-    SidecarEdit done = removeEverywhere(edit, arguments.id, arguments.sidecar, arguments.options.dryRun, report.count);
-    report.backup = done.backup;
-    if (done.where != edit.target())
-        report.where = done.where;
-    print(arguments, output, report);
+    if (count > 0)
+        report = removeFromContainer(arguments);
+    report.size = -1;
+    const SidecarRemoval beside = sidecars.remove(arguments.id);
+    if (report.count + beside.count == 0)
+        throw Failure("has no chunk \"" + fourCCText(arguments.id) + "\", and neither have its sidecars");
+    if (report.count == 0)
+        report.where = beside.where;
+    report.count += beside.count;
+    return report;
 }
 
 void addChunk(const EditArguments& arguments, const OutputOptions& output)
@@ -226,35 +188,13 @@ void addChunk(const EditArguments& arguments, const OutputOptions& output)
     if (arguments.id == 0)
         throw Failure("an id of four zero bytes cannot be told from no chunk");
     const Bytes body = readAll(arguments.from);
-    if (!arguments.sidecar.empty())
-        return addAnywhereOrRefuse(arguments, output, body);
-    SafeEdit edit(arguments.file, arguments.options);
-    EditReport report{"add", 1, static_cast<std::int64_t>(body.size())};
-    {
-        CAudioFileIO file;
-        openContainer(file, edit.target(), 0);
-        const ChunkSurvey found = surveyChunks(file, arguments.id);
-        refuseUnlessForced(objectionToAdding(file, found, arguments.id, report.size), arguments.force);
-        report.replaced = arguments.replace ? found.count : 0;
-    }
-    if (!arguments.options.dryRun)
-        report.backup = edit.apply([&](const std::string& path) { addTo(path, arguments, body); });
-    print(arguments, output, report);
+    print(arguments, output,
+          arguments.sidecar.empty() ? addToContainer(arguments, body) : addAnywhere(arguments, body));
 }
 
 void removeChunks(const EditArguments& arguments, const OutputOptions& output)
 {
-    if (!arguments.sidecar.empty())
-        return removeEverywhereOrRefuse(arguments, output);
-    SafeEdit edit(arguments.file, arguments.options);
-    const ChunkSurvey found = survey(edit.target(), arguments.id);
-    if (found.count == 0)
-        throw Failure("has no chunk \"" + fourCCText(arguments.id) + "\"");
-    refuseUnlessForced(objectionToRemoving(found, arguments.id), arguments.force);
-    EditReport report{"remove", found.count, found.total};
-    if (!arguments.options.dryRun)
-        report.backup = edit.apply([&](const std::string& path) { removeFrom(path, arguments.id); });
-    print(arguments, output, report);
+    print(arguments, output, arguments.sidecar.empty() ? removeFromContainer(arguments) : removeEverywhere(arguments));
 }
 
 CLI::App& declareEdit(CommandLine& commandLine, CLI::App& chunks, const std::string& name,
@@ -270,7 +210,8 @@ CLI::App& declareEdit(CommandLine& commandLine, CLI::App& chunks, const std::str
         &chunks);
     CommandLine::addFile(verb, arguments.file)->required();
     CommandLine::addChunkId(verb, arguments.id)->required();
-    verb.add_flag("--force", arguments.force, "Do it even where sound or other data would be lost");
+    verb.add_flag("--force", arguments.force,
+                  "Do it even where sound or other data would be lost, or a sidecar is a recording");
     addSidecarOption(verb, arguments.sidecar);
     CommandLine::addEditOptions(verb, arguments.options);
     return verb;

@@ -23,6 +23,7 @@ struct GetArguments {
     std::string file;
     FourCC id = 0;
     std::string out;
+    OutputFile::Existing existing = OutputFile::Existing::refuse;
     std::string sidecar; // the extension; empty: only the container itself
 };
 
@@ -69,7 +70,7 @@ void put(const Source& body, const GetArguments& arguments)
     if (arguments.out.empty() || arguments.out == "-")
         getToOutput(body, arguments.out == "-");
     else
-        writeOutputFile(arguments.out, arguments.file, body);
+        writeOutputFile(arguments.out, arguments.file, arguments.existing, body);
 }
 
 void getFromAnywhere(const GetArguments& arguments, const OutputOptions& options)
@@ -114,5 +115,6 @@ void declareChunksGet(CommandLine& commandLine, CLI::App& chunks)
     CommandLine::addFile(verb, arguments.file)->required();
     CommandLine::addChunkId(verb, arguments.id)->required();
     CommandLine::addPath(verb, "-o,--output", arguments.out, "The file to write")->option_text("OUT");
+    CommandLine::addForceOption(verb, arguments.existing);
     addSidecarOption(verb, arguments.sidecar);
 }

@@ -7,6 +7,7 @@
 
 #include <algorithm>
 #include <array>
+#include <charconv>
 #include <memory>
 #include <new>
 #include <string_view>
@@ -53,6 +54,8 @@ std::string chunkIdProblem(std::string& argument)
                      "\" is no chunk id: one to four printable characters, or \\xNN for any byte";
 }
 
+constexpr double kLongestTimeout = 1e9; // 31 years
+
 constexpr std::array<std::pair<std::string_view, ColorMode>, 3> kColorModes{
     {{"auto", ColorMode::automatic}, {"always", ColorMode::always}, {"never", ColorMode::never}}};
 
@@ -61,6 +64,15 @@ std::string colorProblem(std::string& argument)
     const bool known =
         std::any_of(kColorModes.begin(), kColorModes.end(), [&](const auto& mode) { return mode.first == argument; });
     return known ? "" : "\"" + printable(argument) + "\" is none of auto, always, never";
+}
+
+std::string secondsProblem(std::string& argument)
+{
+    double seconds = -1;
+    const char* const end = argument.data() + argument.size();
+    const auto read = std::from_chars(argument.data(), end, seconds);
+    const bool known = read.ec == std::errc() && read.ptr == end && seconds >= 0 && seconds <= kLongestTimeout;
+    return known ? "" : "\"" + printable(argument) + "\" is no number of seconds, 0 or more";
 }
 
 // The group of options that are words for another program, behind "--".
@@ -207,11 +219,23 @@ CLI::Option* CommandLine::addPath(CLI::App& verb, const std::string& name, std::
     return verb.add_option(name, path, description)->transform(CLI::Validator(pathProblem, ""));
 }
 
+void CommandLine::addForceOption(CLI::App& verb, OutputFile::Existing& existing)
+{
+    verb.add_flag_callback(
+        "--force", [&existing] { existing = OutputFile::Existing::replace; }, "Replace a file that is there");
+}
+
 void CommandLine::addEditOptions(CLI::App& verb, EditOptions& options)
 {
     verb.add_flag("--in-place", options.inPlace, "Change the file itself, not a copy that takes its place");
     verb.add_flag("--dry-run", options.dryRun, "Say what would be done, and do nothing");
     verb.add_flag("--backup", options.backup, "Keep the original as FILE.bak, FILE.bak.1, ...");
+    verb.add_option_function<double>(
+            "--timeout", [&options](double seconds) { options.timeout = seconds; },
+            "Give up when others hold the file for that long")
+        ->option_text("SECONDS")
+        ->check(CLI::Validator(secondsProblem, ""));
+    verb.add_flag("--keep-times", options.keepTimes, "Keep the time of the last modification");
 }
 
 void CommandLine::addHelpVerb()
@@ -248,7 +272,7 @@ int CommandLine::parseAndRun(std::vector<std::string> arguments)
         while (!verb->get_subcommands().empty())
             verb = verb->get_subcommands().front();
         if (verb == &app_) {
-            fmt::print(stderr, "{}", app_.help());
+            std::fputs(app_.help().c_str(), stderr);
             return kExitUsage;
         }
         return work_.at(verb)() ? kExitOK : failureStatus_;
@@ -259,7 +283,7 @@ int CommandLine::parseAndRun(std::vector<std::string> arguments)
         Output::standard().print("{}\n", version.what());
         return kExitOK;
     } catch (const CLI::ParseError& error) {
-        fmt::print(stderr, "ktfiles: {}\nTry \"ktfiles help\".\n", usageMessage(error));
+        std::fputs(fmt::format("ktfiles: {}\nTry \"ktfiles help\".\n", usageMessage(error)).c_str(), stderr);
         return kExitUsage;
     }
 }

@@ -2,6 +2,7 @@
 #pragma once
 
 #include "Output.h"
+#include "OutputFile.h"
 #include "SafeEdit.h"
 #include "platform/core/FourCC.h"
 
@@ -36,6 +37,8 @@ public:
     /// An option whose value names a file; "-" stands for standard input or output.
     static CLI::Option* addPath(CLI::App& verb, const std::string& name, std::string& path,
                                 const std::string& description);
+    /// "--force", of verbs that write files of the user's choice.
+    static void addForceOption(CLI::App& verb, OutputFile::Existing& existing);
     static void addEditOptions(CLI::App& verb, EditOptions& options);
 
     /// The exit status when the verb's work tells that not all went well, in the place of kExitFailed.

@@ -109,7 +109,7 @@ std::string damageTo(const DecodeSource& source)
 
 void tell(const std::string& path, const std::string& note)
 {
-    fmt::print(stderr, "ktfiles: {}: {}\n", printableOnError(path), printableOnError(note));
+    reportFailure(path, note);
 }
 
 void tellAll(const std::string& path, const DecodeSource& source, const DecodeResult& result)

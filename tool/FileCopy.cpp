@@ -108,7 +108,7 @@ void copyContent(int from, int to, Progress& progress)
     }
 }
 
-void copyAttributes(int from, const struct stat& status, int to)
+void copyAttributes(int from, const struct stat& status, int to, Times times)
 {
     struct stat own = {};
     if (::fstat(to, &own) != 0)
@@ -119,8 +119,8 @@ void copyAttributes(int from, const struct stat& status, int to)
     if (::fchmod(to, status.st_mode & 07777) != 0) // behind the owner, whose change takes set-id bits away
         failWithErrno();
     copyExtendedAttributes(from, to);
-    const timespec times[2] = {status.st_atim, status.st_mtim};
-    if (::futimens(to, times) != 0)
+    const timespec stamps[2] = {status.st_atim, times == Times::kept ? status.st_mtim : timespec{0, UTIME_NOW}};
+    if (::futimens(to, stamps) != 0)
         failWithErrno();
 }
 

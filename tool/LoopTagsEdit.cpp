@@ -144,7 +144,7 @@ void editFile(const std::string& path, const TagsEditor& editor, const EditOptio
     const TagsPlan plan = editor.plan(readLoopTags(edit.target()), edit.target());
     std::string backup;
     if (!options.dryRun && !plan.changes.empty())
-        backup = edit.apply([&](const std::string& copy) { writeTags(copy, plan); });
+        backup = edit.apply(EditScope::ofLoopTags(), [&](const std::string& copy) { writeTags(copy, plan); });
     report.add(path, plan, backup);
 }
 
@@ -197,7 +197,7 @@ bool editTags(const std::vector<std::string>& files, const TagsEditor& editor, E
     edit.quiet = output.quiet;
     for (const std::string& path : files)
         try {
-            const FileAccess access = accessForReading(path, {.quiet = output.quiet});
+            const FileAccess access = accessForReading(path, edit.waiting());
             editor.plan(readLoopTags(path), path);
         } catch (const Failure&) { // reported when its turn comes
         }

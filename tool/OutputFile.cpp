@@ -1,6 +1,8 @@
 #include "OutputFile.h"
 
 #include "Failure.h"
+#include "FileCopy.h"
+#include "Progress.h"
 
 #include <algorithm>
 #include <cerrno>
@@ -57,7 +59,7 @@ OutputFile::OutputFile(const std::string& out, const std::string& source, Existi
         throw Failure(out + ": " + systemErrorText(errno));
     const mode_t mask = ::umask(0);
     ::umask(mask);
-    mode_ = exists ? found.st_mode & 0777 : 0666 & ~mask;
+    mode_ = 0666 & ~mask;
     file_.emplace(target_);
 }
 
@@ -88,15 +90,59 @@ void OutputFile::finish()
         return;
     if (::fchmod(file_->descriptor(), mode_) != 0)
         throw Failure(systemErrorText(errno));
-    if (existing_ == Existing::replace)
-        file_->replace(target_);
+    synchronize(file_->descriptor());
+    if (const Descriptor replaced = replaced_.empty() ? Descriptor() : openRegularFile(replaced_, O_RDWR))
+        takePlaceOf(replaced);
+    else if (existing_ == Existing::replace)
+        file_->replace();
     else if (!file_->publish(target_)) // it came meanwhile
         failSinceItExists(out_);
+    if (!file_->synchronizeFolder())
+        throw Failure("the output is written, but its folder cannot be committed to storage: " +
+                      systemErrorText(errno));
 }
 
-void writeOutputFile(const std::string& out, const std::string& source, const std::function<void(const Sink&)>& produce)
+void OutputFile::takePlaceOf(const Descriptor& replaced)
 {
-    OutputFile file(out, source, OutputFile::Existing::replace);
+    struct stat status = {};
+    if (::fstat(replaced.get(), &status) != 0)
+        failToWrite(errno);
+    if (status.st_nlink > 1)
+        return writeInto(replaced);
+    try {
+        copyAttributes(replaced.get(), status, file_->descriptor(), Times::now);
+    } catch (const Failure&) { // an owner that we cannot give it
+        return writeInto(replaced);
+    }
+    file_->replace();
+}
+
+// Room is made sure of while the old content is still there.
+void OutputFile::writeInto(const Descriptor& replaced)
+{
+    struct stat status = {};
+    if (::fstat(file_->descriptor(), &status) != 0)
+        failToWrite(errno);
+    if (::fallocate(replaced.get(), FALLOC_FL_KEEP_SIZE, 0, std::max<off_t>(status.st_size, 1)) != 0 && errno == ENOSPC)
+        failToWrite(errno);
+    if (::ftruncate(replaced.get(), 0) != 0)
+        failToWrite(errno);
+    Progress progress("writing", status.st_size, true);
+    copyContent(file_->descriptor(), replaced.get(), progress);
+    synchronize(replaced.get());
+}
+
+void requireFreeName(const std::string& out, OutputFile::Existing existing)
+{
+    struct stat found = {};
+    if (existing == OutputFile::Existing::refuse && ::stat(out.c_str(), &found) == 0 && S_ISREG(found.st_mode))
+        failSinceItExists(out);
+}
+
+void writeOutputFile(const std::string& out, const std::string& source, OutputFile::Existing existing,
+                     const std::function<void(const Sink&)>& produce)
+{
+    OutputFile file(out, source, existing);
     produce([&](std::string_view bytes) { file.write(bytes); });
     file.finish();
 }

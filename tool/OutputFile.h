@@ -30,14 +30,18 @@ public:
     bool isRegular() const { return file_.has_value(); }
     /// Of a regular file only.
     void rewrite(std::int64_t offset, std::string_view bytes);
-    const std::string& path() const { return file_->path(); }
+    std::string path() const { return file_->path(); }
     /// The path of the regular file that it is going to replace; empty when there is none.
     const std::string& replaced() const { return replaced_; }
 
-    /// Without this, nothing has been written.
+    /// Without this, nothing has been written. What is replaced keeps its owner, mode, extended attributes and all of
+    /// its names: where no other file can have them, the content goes into it.
     void finish();
 
 private:
+    void takePlaceOf(const Descriptor& replaced);
+    void writeInto(const Descriptor& replaced);
+
     std::string out_, target_, replaced_; // as given, and with symbolic links resolved
     Existing existing_;
     mode_t mode_ = 0;
@@ -45,6 +49,9 @@ private:
     Descriptor device_;
 };
 
-/// Writes what `produce` hands to the sink to `out`, in the place of what has the name. Throws Failure.
-void writeOutputFile(const std::string& out, const std::string& source,
+/// Throws the Failure of a file that an OutputFile would not replace: ahead of long work.
+void requireFreeName(const std::string& out, OutputFile::Existing existing);
+
+/// Writes what `produce` hands to the sink to `out`. Throws Failure.
+void writeOutputFile(const std::string& out, const std::string& source, OutputFile::Existing existing,
                      const std::function<void(const Sink&)>& produce);

@@ -25,6 +25,7 @@ struct OverviewArguments {
     SoundLength start;
     std::optional<SoundLength> end, frames;
     PictureColors colors = defaultColors();
+    OutputFile::Existing existing = OutputFile::Existing::refuse;
     bool fromStored = false;
     bool store = false;
     EditOptions edit;
@@ -32,10 +33,11 @@ struct OverviewArguments {
     bool draws() const { return !png.empty() || !svg.empty(); }
 };
 
-void writePicture(const std::string& out, const std::string& path, const std::string& bytes)
+void writePicture(const std::string& out, const std::string& path, OutputFile::Existing existing,
+                  const std::string& bytes)
 {
     if (out != "-") {
-        writeOutputFile(out, path, [&](const Sink& sink) { sink(bytes); });
+        writeOutputFile(out, path, existing, [&](const Sink& sink) { sink(bytes); });
         return;
     }
     Output::standard().write(bytes);
@@ -59,10 +61,19 @@ void drawPictures(const std::string& path, const Waveform& waveform, const Overv
         throw Failure("there is nothing between the start and the end of the picture");
     const WaveformPicture picture = pictureOf(waveform, settings);
     if (!arguments.png.empty())
-        writePicture(arguments.png, path, pngOf(picture, arguments.colors));
+        writePicture(arguments.png, path, arguments.existing, pngOf(picture, arguments.colors));
     if (!arguments.svg.empty())
-        writePicture(arguments.svg, path,
+        writePicture(arguments.svg, path, arguments.existing,
                      svgOf(picture, arguments.colors, std::filesystem::path(path).filename().string()));
+}
+
+// Ahead of the reading, which may take minutes. One that is the file itself is refused later, whatever is asked for.
+void requireFreeNames(const std::string& path, const OverviewArguments& arguments)
+{
+    std::error_code error;
+    for (const std::string& out : {arguments.png, arguments.svg})
+        if (!out.empty() && out != "-" && !std::filesystem::equivalent(out, path, error))
+            requireFreeName(out, arguments.existing);
 }
 
 void workOn(const std::string& path, const OverviewArguments& arguments, OverviewReport& report)
@@ -73,6 +84,7 @@ void workOn(const std::string& path, const OverviewArguments& arguments, Overvie
                         .height = arguments.picture.height,
                         .store = {},
                         .dryRun = arguments.edit.dryRun};
+    requireFreeNames(path, arguments);
     std::optional<SafeEdit> edit; // ahead of the reading, so that it notices changes made meanwhile
     FileAccess access;
     if (arguments.store) {
@@ -97,11 +109,12 @@ void requireSense(const OverviewArguments& arguments, const CLI::App& verb, cons
     if (arguments.draws() && arguments.files.size() > 1)
         throw CLI::ValidationError("--png and --svg draw one file at a time");
     if (!arguments.draws())
-        for (const char* const option : {"--width", "--height", "--start", "--end", "--frames", "--colors", "--scale"})
+        for (const char* const option :
+             {"--width", "--height", "--start", "--end", "--frames", "--colors", "--scale", "--force"})
             if (given(option))
                 throw CLI::ValidationError(std::string(option) + " is about a picture: --png or --svg says where to");
     if (!arguments.store)
-        for (const char* const option : {"--in-place", "--dry-run", "--backup"})
+        for (const char* const option : {"--in-place", "--dry-run", "--backup", "--keep-times", "--timeout"})
             if (given(option))
                 throw CLI::ValidationError(std::string(option) + " is about --store");
     if (arguments.store && arguments.fromStored)
@@ -151,6 +164,7 @@ void addPictureOptions(CLI::App& verb, OverviewArguments& arguments)
 {
     CommandLine::addPath(verb, "--png", arguments.png, "Draw a PNG; \"-\" is standard output")->option_text("OUT");
     CommandLine::addPath(verb, "--svg", arguments.svg, "Draw an SVG; \"-\" is standard output")->option_text("OUT");
+    CommandLine::addForceOption(verb, arguments.existing);
     addSize(verb, "--width", arguments.picture.width, kWidths);
     addSize(verb, "--height", arguments.picture.height, kHeights);
     addSoundRange(verb, {.start = [&arguments](const SoundLength& start) { arguments.start = start; },

@@ -16,6 +16,7 @@ namespace {
 
 constexpr FourCC kOverviewId = fourCC("LGWV");
 constexpr FourCC kCAFOverviewId = fourCC("ovvw");
+const EditScope kScope{EditScope::Kind::chunks, {kOverviewId, kCAFOverviewId}, false};
 
 std::unique_ptr<KTMem> storedIn(const std::string& path)
 {
@@ -86,6 +87,6 @@ StoreResult storeOverview(SafeEdit& edit, FileOverview& overview, const EditOpti
     const std::size_t size = overview.block().size() * (overview.info().fileType == kCaff ? 2 : 1);
     refuseObjections(edit.target(), overview, size);
     if (!options.dryRun)
-        result.backup = edit.apply([&](const std::string& path) { write(path, overview, result.stored); });
+        result.backup = edit.apply(kScope, [&](const std::string& path) { write(path, overview, result.stored); });
     return result;
 }

@@ -71,7 +71,7 @@ void renameAlternative(const ProjectArguments& arguments, const OutputOptions& o
         (*info)[ProjectInfoKey::variantNames] = std::move(names);
         std::string backup;
         if (!arguments.edit.dryRun)
-            backup = edit.apply([&](const std::string& path) {
+            backup = edit.apply(EditScope::wholeFile(), [&](const std::string& path) {
                 platform::Error error;
                 const auto target = platform::URL::createWithFileSystemPath(platform::String::fromUTF8(path),
                                                                             platform::PathStyle::posix, false);

@@ -1,73 +1,123 @@
 #include "SidecarChunks.h"
 
 #include "CommandLine.h"
-#include "EditGuards.h"
+#include "ContainerChanges.h"
 #include "Failure.h"
+#include "FileCopy.h"
 #include "InputFile.h"
-#include "audiofile/ChunkUtilities.h"
-#include "files/CFileUtil.h"
+#include "TemporaryFile.h"
+#include "audiofile/BusFormats.h"
 
 #include <algorithm>
+#include <cerrno>
+#include <fcntl.h>
+#include <filesystem>
+#include <fstream>
+#include <sys/stat.h>
+#include <unistd.h>
 
 namespace {
 
 constexpr char kMetadataExtension[] = "ktmd";
 
-void asItIs(void*, long, unsigned char)
+std::string resolved(const std::string& path)
 {
+    requireRegularFile(path);
+    std::error_code error;
+    const std::filesystem::path canonical = std::filesystem::canonical(path, error);
+    if (error)
+        throw Failure(systemErrorText(error.value()));
+    return canonical.string();
 }
 
-CChunkData chunkOf(FourCC id, const Bytes& body = {})
+bool isRegularFile(const std::string& path)
 {
-    CChunkData chunk;
-    chunk.id = id;
-    chunk.size = std::ssize(body);
-    chunk.data = std::make_unique<char[]>(body.size());
-    std::copy_n(reinterpret_cast<const char*>(body.data()), body.size(), chunk.data.get());
-    return chunk;
+    struct stat status = {};
+    return !path.empty() && ::stat(path.c_str(), &status) == 0 && S_ISREG(status.st_mode);
 }
 
-/// Empty when the file itself has that name.
-CFileRef beside(const std::string& path, const std::string& extension)
+bool isSameFile(const std::string& a, const std::string& b)
 {
-    const CFileRef file = referenceTo(path);
-    CFileRef sidecar = file;
+    std::error_code error; // of those that are not both there
+    return a == b || std::filesystem::equivalent(a, b, error);
+}
+
+std::string beside(const std::string& path, const std::string& extension)
+{
+    CFileRef sidecar = referenceTo(path);
     sidecar.ReplaceExtensionBy(extension);
-    return sidecar == file ? CFileRef::None : sidecar;
+    return std::string(sidecar);
 }
 
-/// The chunk of the id in a container in memory; null when the bytes are none, and an empty one when it is not there.
-std::optional<Bytes> chunkIn(BytesView content, FourCC id, bool& isContainer)
-{
-    CAudioFileIO file;
-    const auto block = std::make_shared<KTMem>(content.size());
-    std::copy(content.begin(), content.end(), block->data());
-    requireOK(file.SetCache(block));
-    requireOK(file.Open(CFileRef(), kFileIOMemory));
-    isContainer = file.Info().fileType == kCaff || file.IsChunkBased() != 0;
-    return isContainer ? file.FindChunk(id) : std::nullopt;
-}
+struct SidecarNames {
+    std::string metadata, raw; // empty: none
 
-std::int64_t countIn(const CFileRef& container, FourCC id)
-{
-    CAudioFileIO file;
-    std::int64_t count = 0;
-    if (container.IsFile() && file.Open(container, 0) == kStatusOK)
-        file.ForEachChunk([&](const ChunkEntry& chunk) { return count += chunk.id == id, true; });
-    return count;
-}
-
-void removeFromContainer(const CFileRef& container, FourCC id)
-{
-    for (std::int64_t left = countIn(container, id), before = left + 1; left > 0 && left < before;) {
-        CAudioFileIO file;
-        requireOK(file.Open(container, kFileIOReadWrite));
-        file.RemoveChunk(id);
-        requireOK(file.Close());
-        before = std::exchange(left, countIn(container, id));
+    SidecarNames(const std::string& file, const std::string& extension)
+        : metadata(beside(file, kMetadataExtension)),
+          raw(beside(file, extension))
+    {
+        if (isSameFile(raw, file) || isSameFile(raw, metadata))
+            raw.clear();
+        if (isSameFile(metadata, file))
+            metadata.clear();
     }
-    if (countIn(container, id) > 0)
-        throw Failure("the chunk \"" + fourCCText(id) + "\" cannot be removed from " + std::string(container));
+};
+
+/// None when it is not there; throws Failure when it cannot be read.
+std::optional<Bytes> chunkIn(const std::string& container, FourCC id)
+{
+    CAudioFileIO file;
+    openContainer(file, container, 0);
+    CChunkData chunk;
+    const std::int32_t found = file.FindChunk(id, chunk);
+    if (found == 0)
+        return std::nullopt;
+    if (found != 1)
+        throw Failure(container + ": its chunk \"" + fourCCText(id) + "\" cannot be read");
+    const BytesView body = chunk.bytes();
+    return Bytes(body.begin(), body.end());
+}
+
+Bytes contentOf(const std::string& path)
+{
+    CFileIO file;
+    requireOK(file.OpenRead(referenceTo(path), 0));
+    Bytes content(static_cast<std::size_t>(file.GetEOF()));
+    requireOK(file.Read(content.data(), static_cast<long>(content.size())));
+    return content;
+}
+
+std::int64_t sizeOf(const std::string& path)
+{
+    struct stat status = {};
+    if (::stat(path.c_str(), &status) != 0)
+        throw Failure(systemErrorText(errno));
+    return status.st_size;
+}
+
+/// What an interrupted creation leaves: less than a container, and what is there is the start of one.
+bool isTorn(const std::string& path)
+{
+    constexpr std::int64_t kLeast = 20;
+    constexpr std::string_view kStart = "FORM";
+    if (sizeOf(path) >= kLeast)
+        return false;
+    const Bytes content = contentOf(path);
+    return textOf(content).substr(0, kStart.size()) == kStart.substr(0, content.size());
+}
+
+/// Whatever the file holds, it is an AIFF file without sound then, with the one chunk.
+void makeMetadata(const std::string& path, FourCC id, const Bytes& body)
+{
+    CAudioFileIO file;
+    requireOK(file.CreateAndOpenCommon(referenceTo(path), 0, kAudioBusMono, 0, 16, 44100, kAIFF, true));
+    requireOK(file.Close());
+    addChunkTo(path, {id, body, false, false});
+}
+
+[[noreturn]] void failToChange(const std::string& sidecar, const Failure& failure)
+{
+    throw Failure(sidecar + ": " + failure.what());
 }
 
 } // namespace
@@ -92,71 +142,158 @@ bool keepsItsChunks(const std::string& path)
 
 SidecarChunk readFromAnywhere(const std::string& path, FourCC id, const std::string& extension)
 {
-    const std::string missing = "has no chunk \"" + fourCCText(id) + "\", and neither have its sidecars";
-    CChunkData chunk = chunkOf(id);
-    const CFileRef metadata = beside(path, kMetadataExtension);
-    const bool isFromMetadata = metadata.IsFile() && CFileUtilFileSize(metadata) > 0;
-    const std::int32_t status = CFileUtilReadData(referenceTo(path), chunk, extension.c_str(), asItIs);
-    if (status == -1)
-        throw Failure(missing);
-    requireOK(status);
-    const BytesView body = chunk.bytes();
-    if (chunk.position > 0 || !isFromMetadata) {
-        const CFileRef raw = beside(path, extension);
-        return {Bytes(body.begin(), body.end()), countIn(raw, id) > 0 ? std::string(raw) : path};
+    const std::string file = resolved(path);
+    const SidecarNames names(file, extension);
+    if (isRegularFile(names.metadata) && !isTorn(names.metadata)) {
+        if (!keepsItsChunks(names.metadata))
+            return {contentOf(names.metadata), names.metadata};
+        if (auto body = chunkIn(names.metadata, id))
+            return {std::move(*body), names.metadata};
     }
-    bool isContainer = false;
-    std::optional<Bytes> inside = chunkIn(body, id, isContainer);
-    if (isContainer && !inside)
-        throw Failure(missing);
-    return {inside ? std::move(*inside) : Bytes(body.begin(), body.end()), std::string(metadata)};
+    if (isRegularFile(names.raw) && keepsItsChunks(names.raw))
+        if (auto body = chunkIn(names.raw, id))
+            return {std::move(*body), names.raw};
+    if (keepsItsChunks(file))
+        if (auto body = chunkIn(file, id))
+            return {std::move(*body), path};
+    throw Failure("has no chunk \"" + fourCCText(id) + "\", and neither have its sidecars");
 }
 
-SidecarEdit addAnywhere(SafeEdit& edit, FourCC id, const Bytes& body, const std::string& extension, bool dryRun)
+Sidecars::Sidecars(const std::string& path, const std::string& extension, const EditOptions& options)
+    : file_(resolved(path)),
+      options_(options)
 {
-    const CChunkData chunk = chunkOf(id, body);
-    const CFileRef raw = beside(edit.target(), extension);
-    const CFileRef metadata = beside(edit.target(), kMetadataExtension);
-    const auto add = [&](const std::string& path, const CFileRef& container) {
-        requireOK(CFileUtilAddData(referenceTo(path), chunk, extension.c_str(), 0, asItIs));
+    const SidecarNames names(file_, extension);
+    metadata_ = names.metadata;
+    raw_ = names.raw;
+    options_.inPlace = options_.backup = false; // they are small
+}
+
+std::optional<std::string> Sidecars::objection() const
+{
+    if (!isRegularFile(raw_))
+        return std::nullopt;
+    CAudioFileIO file;
+    requireOK(file.Open(referenceTo(raw_), 0));
+    if (file.Info().fileType == 0 && file.IsChunkBased() == 0)
+        return std::nullopt;
+    return raw_ + " is an audio file of its own, and would be lost as an older copy of the chunk";
+}
+
+std::string Sidecars::add(FourCC id, const Bytes& body, bool force)
+{
+    if (metadata_.empty())
+        throw Failure("is no container, and has the name that its metadata sidecar would have");
+    try {
+        addToMetadata(id, body, force);
+    } catch (const Failure& failure) {
+        failToChange(metadata_, failure);
+    }
+    rewriteRaw(body);
+    return metadata_;
+}
+
+void Sidecars::addToMetadata(FourCC id, const Bytes& body, bool force)
+{
+    // Whoever else makes it meanwhile is found the next time.
+    while (!isRegularFile(metadata_))
+        if (options_.dryRun || createMetadata(id, body))
+            return;
+    SafeEdit edit(metadata_, options_);
+    std::optional<std::string> objection;
+    const bool torn = isTorn(edit.target());
+    const bool isWhole = !torn && keepsItsChunks(edit.target());
+    if (isWhole) {
         CAudioFileIO file;
-        const std::optional<Bytes> found = file.Open(container, 0) == kStatusOK ? file.FindChunk(id) : std::nullopt;
-        if (!found || *found != body) // what the library does not tell
-            throw Failure("the chunk could not be added");
-    };
-    if (!keepsItsChunks(edit.target())) {
-        if (!dryRun)
-            add(edit.target(), metadata);
-        return {std::string(metadata), ""};
+        openContainer(file, edit.target(), 0);
+        objection = objectionToAdding(file, surveyChunks(file, id), id, std::ssize(body));
+    } else if (!torn) {
+        objection = "is no metadata sidecar, and would be lost";
     }
-    SidecarEdit done{edit.target(), ""};
-    if (!dryRun) {
-        done.backup = edit.apply([&](const std::string& path) { add(path, referenceTo(path)); });
-        if (raw.IsFile()) // an older copy; the edit was of the file under another name
-            requireOK(CFileUtilDelete(raw));
-    }
-    return done;
+    if (objection && !force)
+        throw Failure(*objection + "; --force does it all the same");
+    if (options_.dryRun)
+        return;
+    if (isWhole)
+        edit.apply(objection ? EditScope::wholeFile() : EditScope::chunk(id), [&](const std::string& path) {
+            addChunkTo(path, {id, body, true, force});
+        });
+    else
+        edit.apply(EditScope::wholeFile(), [&](const std::string& path) { makeMetadata(path, id, body); });
 }
 
-SidecarEdit removeEverywhere(SafeEdit& edit, FourCC id, const std::string& extension, bool dryRun, std::int64_t& count)
+/// False when somebody else was faster.
+bool Sidecars::createMetadata(FourCC id, const Bytes& body)
 {
-    const CFileRef raw = beside(edit.target(), extension);
-    const CFileRef metadata = beside(edit.target(), kMetadataExtension);
-    const std::int64_t inFile = countIn(referenceTo(edit.target()), id);
-    const std::int64_t inMetadata = countIn(metadata, id);
-    count = inFile + inMetadata + (raw.IsFile() ? 1 : 0);
-    if (count == 0)
-        throw Failure("has no chunk \"" + fourCCText(id) + "\", and neither have its sidecars");
-    SidecarEdit done{inFile > 0 ? edit.target() : raw.IsFile() ? std::string(raw) : std::string(metadata), ""};
-    if (dryRun)
-        return done;
-    if (inFile > 0)
-        done.backup = edit.apply([&](const std::string& path) {
-            requireOK(CFileUtilRemoveData(referenceTo(path), chunkOf(id), extension.c_str()));
-            removeFromContainer(referenceTo(path), id); // further ones of a CAF file
-        });
-    if (raw.IsFile())
-        requireOK(CFileUtilDelete(raw));
-    removeFromContainer(metadata, id);
-    return done;
+    const FileAccess access =
+        accessForWriting(metadata_, platform::FileCoordinator::WritingOptions::none, options_.waiting());
+    struct stat sound = {};
+    if (::stat(file_.c_str(), &sound) != 0)
+        throw Failure(systemErrorText(errno));
+    TemporaryFile made(metadata_);
+    makeMetadata(made.path(), id, body);
+    // Whoever may read the one may read the other; the owner where that can be had.
+    if (::fchown(made.descriptor(), sound.st_uid, sound.st_gid) != 0 && errno != EPERM)
+        throw Failure(systemErrorText(errno));
+    if (::fchmod(made.descriptor(), sound.st_mode & 0666) != 0)
+        throw Failure(systemErrorText(errno));
+    synchronize(made.descriptor());
+    if (!made.publish(metadata_))
+        return false;
+    if (!made.synchronizeFolder())
+        throw Failure("is edited, but a loss of power now may undo that: its folder cannot be committed to storage: " +
+                      systemErrorText(errno));
+    return true;
+}
+
+void Sidecars::rewriteRaw(const Bytes& body)
+{
+    if (!isRegularFile(raw_))
+        return;
+    try {
+        SafeEdit edit(raw_, options_);
+        if (!options_.dryRun)
+            edit.apply(EditScope::wholeFile(), [&](const std::string& path) {
+                CFileIO file;
+                requireOK(file.Open(referenceTo(path), kFileIOReadWrite));
+                requireOK(file.SetEOF(0));
+                requireOK(file.Write(body.data(), 0, static_cast<long>(body.size())));
+                requireOK(file.Close());
+            });
+    } catch (const Failure& failure) {
+        failToChange(raw_, failure);
+    }
+}
+
+void Sidecars::removeRaw()
+{
+    if (!isRegularFile(raw_) || options_.dryRun)
+        return;
+    const FileAccess access =
+        accessForWriting(raw_, platform::FileCoordinator::WritingOptions::none, options_.waiting());
+    if (::unlink(raw_.c_str()) != 0 && errno != ENOENT)
+        throw Failure(raw_ + ": " + systemErrorText(errno));
+    synchronizeFolderOf(raw_.c_str());
+}
+
+SidecarRemoval Sidecars::remove(FourCC id)
+{
+    SidecarRemoval removal;
+    if (isRegularFile(metadata_)) {
+        SafeEdit edit(metadata_, options_);
+        if (!isTorn(edit.target()) && keepsItsChunks(edit.target()))
+            removal.count = surveyOf(edit.target(), id).count;
+        if (removal.count > 0) {
+            removal.where = metadata_;
+            if (!options_.dryRun)
+                edit.apply(EditScope::chunk(id),
+                           [&](const std::string& path) { removeChunksFrom(path, id, removal.count); });
+        }
+    }
+    if (isRegularFile(raw_)) {
+        ++removal.count;
+        removal.where = raw_;
+        removeRaw();
+    }
+    return removal;
 }

@@ -17,7 +17,7 @@ bool runCopy(const CopyArguments& arguments, const OutputOptions& output)
 {
     std::shared_ptr<const LoopSource> source;
     if (!reportingFailures(arguments.from, [&] {
-            const FileAccess access = accessForReading(arguments.from, {.quiet = output.quiet});
+            const FileAccess access = accessForReading(arguments.from, arguments.options.waiting());
             source = readLoopSource(arguments.from);
             if (source->isEmpty())
                 throw Failure("has no loop tags");

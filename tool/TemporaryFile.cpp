@@ -14,9 +14,7 @@
 #include <cstring>
 #include <fcntl.h>
 #include <filesystem>
-#include <random>
 #include <string_view>
-#include <sys/stat.h>
 #include <unistd.h>
 
 namespace {
@@ -26,7 +24,8 @@ constexpr std::array kEndingSignals{SIGINT, SIGTERM, SIGHUP, SIGQUIT, SIGPIPE, S
 // The names to remove when a signal ends the process: plain memory, since a handler may use nothing else.
 struct Slot {
     volatile sig_atomic_t used = 0;
-    char path[PATH_MAX] = {};
+    int folder = -1;
+    char name[NAME_MAX + 1] = {};
 };
 std::array<Slot, 4> slots;
 
@@ -34,7 +33,7 @@ extern "C" void removeTemporaryFiles(int signal)
 {
     for (const Slot& slot : slots)
         if (slot.used != 0)
-            ::unlink(slot.path);
+            ::unlinkat(slot.folder, slot.name, 0);
     ::signal(signal, SIG_DFL);
     ::raise(signal);
 }
@@ -55,86 +54,101 @@ void installHandlers()
 }
 
 // The file exists already and is empty; called with the signals held.
-int takeSlot(const std::string& path)
+int takeSlot(int folder, const std::string& name)
 {
     for (std::size_t i = 0; i < slots.size(); ++i)
-        if (slots[i].used == 0 && path.size() < sizeof slots[i].path) {
-            std::memcpy(slots[i].path, path.c_str(), path.size() + 1);
+        if (slots[i].used == 0) {
+            slots[i].folder = folder;
+            std::memcpy(slots[i].name, name.c_str(), name.size() + 1);
             slots[i].used = 1;
             return static_cast<int>(i);
         }
     return -1;
 }
 
-// What the names of all temporary files for `target` begin with. A long name is cut so that the rest has room, at the
-// start of a character: the library opens only names that are UTF-8.
-std::string prefixFor(const std::filesystem::path& target)
+constexpr int kMostNames = 100;
+constexpr int kFirstNames = 4; // more than one edit takes at a time: what was left has one of these, nearly always
+
+// The names of all temporary files for a target, by a rule, so that those that were left are found without a look at
+// every name in the folder. A long name is cut so that the rest has room, at the start of a character: the library
+// opens only names that are UTF-8.
+std::string temporaryName(const std::string& target, int number)
 {
-    constexpr std::size_t kRoom = NAME_MAX - std::string_view("..ktfiles-4194304-01234567").size();
-    std::string name = target.filename().string();
-    std::size_t length = std::min(name.size(), kRoom);
-    while (length < name.size() && length > 0 && (static_cast<unsigned char>(name[length]) & 0xC0) == 0x80)
+    constexpr std::size_t kRoom = NAME_MAX - std::string_view("..ktfiles-99").size();
+    std::size_t length = std::min(target.size(), kRoom);
+    while (length < target.size() && length > 0 && (static_cast<unsigned char>(target[length]) & 0xC0) == 0x80)
         --length;
-    return "." + name.substr(0, length) + ".ktfiles-";
+    return fmt::format(".{}.ktfiles-{}", target.substr(0, length), number);
 }
 
-std::filesystem::path folderOf(const std::filesystem::path& target)
+bool isSame(const struct stat& a, const struct stat& b)
 {
-    return target.has_parent_path() ? target.parent_path() : std::filesystem::path(".");
+    return a.st_dev == b.st_dev && a.st_ino == b.st_ino;
 }
 
-// Only a file that nobody holds locked goes: its process is gone.
-void removeIfAbandoned(const std::filesystem::path& path)
+// Only a file that nobody holds locked goes: its process is gone. Its name is compared once it is locked, since until
+// then it may have been given to another.
+void removeIfAbandoned(int folder, const std::string& name)
 {
-    struct stat status = {};
-    if (::lstat(path.c_str(), &status) != 0 || !S_ISREG(status.st_mode))
+    struct stat named = {}, opened = {};
+    if (::fstatat(folder, name.c_str(), &named, AT_SYMLINK_NOFOLLOW) != 0 || !S_ISREG(named.st_mode))
         return;
-    const Descriptor file(::open(path.c_str(), O_RDWR | O_NOFOLLOW | O_NONBLOCK | O_CLOEXEC));
-    if (file && tryLock(file.get()) == LockResult::locked)
-        ::unlink(path.c_str());
+    const Descriptor file(::openat(folder, name.c_str(), O_RDWR | O_NOFOLLOW | O_NONBLOCK | O_CLOEXEC));
+    if (file && tryLock(file.get()) == LockResult::locked && ::fstat(file.get(), &opened) == 0 &&
+        ::fstatat(folder, name.c_str(), &named, AT_SYMLINK_NOFOLLOW) == 0 && isSame(opened, named))
+        ::unlinkat(folder, name.c_str(), 0);
 }
 
-void removeAbandoned(const std::filesystem::path& target)
+// A folder that may be written but not read serves too; it cannot be committed to storage.
+Descriptor openFolder(const std::string& path)
 {
-    const std::string prefix = prefixFor(target);
-    std::error_code error;
-    std::filesystem::directory_iterator entries(folderOf(target), error);
-    for (; !error && entries != std::filesystem::directory_iterator(); entries.increment(error))
-        if (entries->path().filename().string().starts_with(prefix))
-            removeIfAbandoned(entries->path());
+    Descriptor folder(::open(path.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
+    return folder ? std::move(folder) : Descriptor(::open(path.c_str(), O_PATH | O_DIRECTORY | O_CLOEXEC));
 }
 
 } // namespace
 
 TemporaryFile::TemporaryFile(const std::string& target)
 {
+    const std::filesystem::path path(target);
+    targetName_ = path.filename().string();
+    folder_ = openFolder(path.has_parent_path() ? path.parent_path().string() : ".");
+    if (!folder_)
+        throw Failure("its folder: " + systemErrorText(errno));
     installHandlers();
-    removeAbandoned(target);
-    std::random_device random;
-    for (int attempt = 0; attempt < 100; ++attempt) {
-        path_ = folderOf(target) / fmt::format("{}{}-{:08x}", prefixFor(target), ::getpid(), random());
-        const SignalHold hold;
-        descriptor_ = Descriptor(::open(path_.c_str(), O_RDWR | O_CREAT | O_EXCL | O_NOFOLLOW | O_CLOEXEC, 0600));
-        if (!descriptor_ && errno == EEXIST)
-            continue;
-        if (!descriptor_)
-            throw Failure("no file can be made in its folder: " + systemErrorText(errno));
-        struct stat status = {};
-        // Another run may have taken it for an abandoned one before it was locked.
-        if (tryLock(descriptor_.get()) == LockResult::busy || ::fstat(descriptor_.get(), &status) != 0 ||
-            status.st_nlink == 0)
-            continue;
-        slot_ = takeSlot(path_);
-        return;
-    }
+    for (int number = 0; number < kFirstNames; ++number)
+        removeIfAbandoned(folder_.get(), temporaryName(targetName_, number));
+    for (int number = 0; number < kMostNames; ++number)
+        if (create(temporaryName(targetName_, number)))
+            return;
     throw Failure("no temporary file can be made in its folder");
+}
+
+bool TemporaryFile::create(const std::string& name)
+{
+    const SignalHold hold;
+    Descriptor file(::openat(folder_.get(), name.c_str(), O_RDWR | O_CREAT | O_EXCL | O_NOFOLLOW | O_CLOEXEC, 0600));
+    if (!file && errno == EEXIST) {
+        removeIfAbandoned(folder_.get(), name); // for the next run
+        return false;
+    }
+    if (!file)
+        throw Failure("no file can be made in its folder: " + systemErrorText(errno));
+    struct stat status = {};
+    // Another run may have taken it for an abandoned one before it was locked.
+    if (tryLock(file.get()) == LockResult::busy || ::fstat(file.get(), &status) != 0 || status.st_nlink == 0)
+        return false;
+    descriptor_ = std::move(file);
+    name_ = name;
+    slot_ = takeSlot(folder_.get(), name);
+    return true;
 }
 
 TemporaryFile::~TemporaryFile()
 {
     const SignalHold hold;
-    if (!path_.empty())
-        ::unlink(path_.c_str());
+    if (!name_.empty())
+        ::unlinkat(folder_.get(), name_.c_str(), 0);
     forget();
 }
 
@@ -143,32 +157,57 @@ void TemporaryFile::forget()
     if (slot_ >= 0)
         slots[static_cast<std::size_t>(slot_)].used = 0;
     slot_ = -1;
-    path_.clear();
+    name_.clear();
 }
 
-void TemporaryFile::replace(const std::string& target)
+bool TemporaryFile::targetIs(const struct stat& status) const
+{
+    struct stat named = {};
+    return ::fstatat(folder_.get(), targetName_.c_str(), &named, AT_SYMLINK_NOFOLLOW) == 0 && isSame(named, status);
+}
+
+// In a folder of somebody else's the name may have been given to another file.
+void TemporaryFile::requireItsName() const
+{
+    struct stat named = {}, own = {};
+    if (::fstat(descriptor_.get(), &own) != 0)
+        throw Failure(systemErrorText(errno));
+    if (::fstatat(folder_.get(), name_.c_str(), &named, AT_SYMLINK_NOFOLLOW) != 0 || !isSame(named, own))
+        throw Failure("its temporary file was moved by another program; nothing was done");
+}
+
+void TemporaryFile::replace()
 {
     const SignalHold hold;
-    if (::rename(path_.c_str(), target.c_str()) != 0)
+    requireItsName();
+    if (::renameat(folder_.get(), name_.c_str(), folder_.get(), targetName_.c_str()) != 0)
         throw Failure(systemErrorText(errno));
     forget();
 }
 
-bool TemporaryFile::publish(const std::string& target)
+bool TemporaryFile::publish(const std::string& name)
 {
     const SignalHold hold;
-    if (::renameat2(AT_FDCWD, path_.c_str(), AT_FDCWD, target.c_str(), RENAME_NOREPLACE) == 0) {
+    requireItsName();
+    const std::string last = std::filesystem::path(name).filename().string();
+    if (::renameat2(folder_.get(), name_.c_str(), folder_.get(), last.c_str(), RENAME_NOREPLACE) == 0) {
         forget();
         return true;
     }
     if (errno == EEXIST)
         return false;
     // A file system without that call: a second name, then the first goes, in the destructor.
-    if (::link(path_.c_str(), target.c_str()) == 0)
+    if (::linkat(folder_.get(), name_.c_str(), folder_.get(), last.c_str(), 0) == 0)
         return true;
     if (errno == EEXIST)
         return false;
     throw Failure(systemErrorText(errno));
+}
+
+// File systems that cannot commit folders keep their own promises.
+bool TemporaryFile::synchronizeFolder() const
+{
+    return ::fsync(folder_.get()) == 0 || errno == EINVAL || errno == EBADF;
 }
 
 SignalHold::SignalHold()

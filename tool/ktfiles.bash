@@ -5,7 +5,7 @@ _ktfiles()
     local cur prev words cword
     _init_completion || return
 
-    local common='--json --quiet --color --coordination --help' edit='--in-place --dry-run --backup'
+    local common='--json --quiet --color --coordination --help' edit='--in-place --dry-run --backup --keep-times --timeout'
     local keys='beatCount midiRootNote keyType signatureTop signatureBottom loopFileType instrumentType
         instrumentSubType genre descriptors title artist copyright comments transients key mode signature'
     local projects='media dirs backup restore settle rename-alternative'
@@ -51,13 +51,13 @@ _ktfiles()
     elif [[ $cur == -* ]]; then
         case $verb/$object in
             info/*) COMPREPLY=($(compgen -W "--long $common" -- "$cur")) ;;
-            chunks/get) COMPREPLY=($(compgen -W "--output --sidecar $common" -- "$cur")) ;;
+            chunks/get) COMPREPLY=($(compgen -W "--output --force --sidecar $common" -- "$cur")) ;;
             chunks/add) COMPREPLY=($(compgen -W "--from --replace --sidecar --force $edit $common" -- "$cur")) ;;
             chunks/remove) COMPREPLY=($(compgen -W "--sidecar --force $edit $common" -- "$cur")) ;;
             adm/*) COMPREPLY=($(compgen -W "--long --lenient --check $common" -- "$cur")) ;;
             tags/set | tags/remove | tags/copy) COMPREPLY=($(compgen -W "$edit $common" -- "$cur")) ;;
             overview/*) COMPREPLY=($(compgen -W "--png --svg --width --height --start --end --frames --scale --colors
-                --stored --store $edit $common" -- "$cur")) ;;
+                --force --stored --store $edit $common" -- "$cur")) ;;
             decode/*) COMPREPLY=($(compgen -W "--output --format --rate --channels --bits --start --end --frames --conceal
                 --force $common" -- "$cur")) ;;
             lock/*) COMPREPLY=($(compgen -W "--read --write --presenter --timeout -- $common" -- "$cur")) ;;

@@ -70,16 +70,38 @@ class Get(CommandTest):
     def test_to_a_file(self):
         self.write("a.wav", wave(chunk(b"note", b"text")))
         (self.folder / "link").symlink_to("out")
-        for out in ("out", "link"):  # a new file, then one that is there, through a link
-            self.run_command("chunks", "get", "a.wav", "note", "-o", out, preexec_fn=lambda: os.umask(0o027))
+        for out, *force in (("out",), ("link", "--force")):  # a new file, then one that is there, through a link
+            self.run_command("chunks", "get", "a.wav", "note", "-o", out, *force, preexec_fn=lambda: os.umask(0o027))
             self.assertEqual((self.folder / "out").read_bytes(), b"text")
             self.assertEqual((self.folder / "out").stat().st_mode & 0o777, 0o640)
+        recording = self.write("b.wav", wave(frames=9))
+        self.assertIn("b.wav exists; --force replaces it", self.failure("chunks", "get", "a.wav", "note", "-o", "b.wav"))
+        self.assertEqual(recording.read_bytes(), wave(frames=9))
+        recording.unlink()
         self.assertEqual(self.json("chunks", "get", "a.wav", "note", "-o", "/dev/null"),
                          {"path": "a.wav", "id": "note", "offset": 244, "size": 4})
         self.assertIn("over the file itself", self.failure("chunks", "get", "a.wav", "note", "-o", "a.wav"))
         self.assertIn("is a folder", self.failure("chunks", "get", "a.wav", "note", "-o", "."))
         self.assertIn("file not found", self.failure("chunks", "get", "a.wav", "note", "-o", "none/out"))
         self.assert_no_litter("a.wav", "link", "out")
+
+    def test_what_is_replaced_keeps_what_belongs_to_it(self):
+        self.write("a.wav", wave(chunk(b"note", b"text")))
+        out = self.write("out", b"much longer than what takes its place")
+        os.chmod(out, 0o4751)
+        if os.geteuid() == 0:
+            os.chown(out, 12345, 54321)
+            os.chmod(out, 0o4751)
+        before = out.stat()
+        self.run_command("chunks", "get", "a.wav", "note", "-o", "out", "--force")
+        self.assertEqual(out.read_bytes(), b"text")
+        for field in ("st_mode", "st_uid", "st_gid"):
+            self.assertEqual(getattr(out.stat(), field), getattr(before, field), field)
+        os.link(out, self.folder / "other")
+        self.write("a.wav", wave(chunk(b"note", b"news")))
+        self.run_command("chunks", "get", "a.wav", "note", "-o", "out", "--force")
+        self.assertEqual((self.folder / "other").read_bytes(), b"news")
+        self.assertTrue(os.path.samefile(out, self.folder / "other"))
 
 
 if __name__ == "__main__":

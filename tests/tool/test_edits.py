@@ -5,10 +5,23 @@ import resource
 import signal
 import struct
 import subprocess
+import sys
 import time
 import unittest
 
 from command import KTFILES, CommandTest, caf, chunk, wave
+
+# Holds a lease on a file, as file servers do, and lets go of it when the kernel asks.
+LEASE_HOLDER = """
+import fcntl, signal, sys, time
+file = open(sys.argv[1], "r+b")
+signal.pthread_sigmask(signal.SIG_BLOCK, [signal.SIGIO])
+fcntl.fcntl(file, fcntl.F_SETLEASE, fcntl.F_WRLCK)
+print("held", flush=True)
+signal.sigwait([signal.SIGIO])
+time.sleep(0.2)
+fcntl.fcntl(file, fcntl.F_SETLEASE, fcntl.F_UNLCK)
+"""
 
 
 class Edits(CommandTest):
@@ -95,11 +108,59 @@ class Edits(CommandTest):
         before, attributes = path.stat(), {name: os.getxattr(path, name) for name in os.listxattr(path)}
         self.add("link.wav", "note")
         after = path.stat()
-        for field in ("st_mode", "st_uid", "st_gid", "st_atime_ns", "st_mtime_ns"):
+        for field in ("st_mode", "st_uid", "st_gid", "st_atime_ns"):
             self.assertEqual(getattr(after, field), getattr(before, field), field)
         self.assertNotEqual(after.st_ino, before.st_ino)
         self.assertEqual({name: os.getxattr(path, name) for name in os.listxattr(path)}, attributes)
         self.assertTrue((self.folder / "link.wav").is_symlink())
+
+    def test_time_of_the_last_modification(self):
+        for options in ([], ["--in-place"]):
+            path = self.write("a.wav", wave())
+            os.utime(path, (1, 2))
+            self.add("a.wav", "note", "--keep-times", *options)
+            self.assertEqual(path.stat().st_mtime, 2)
+            start = time.time() - 1  # clocks of file systems are coarse
+            self.add("a.wav", "more", *options)
+            self.assertGreater(path.stat().st_mtime, start)
+
+    def test_an_edit_killed_behind_its_backup_is_finished(self):
+        path = self.write("a.wav", wave())
+        os.link(path, self.folder / "a.wav.bak")  # what is there between the backup and the rename
+        self.assertIn("a.wav.bak is the same file still", self.failure("chunks", "add", "a.wav", "note", "--in-place"))
+        self.assertEqual(path.read_bytes(), wave())
+        self.assertTrue(self.json("chunks", "add", "a.wav", "note", "--backup")["backup"].endswith("a.wav.bak"))
+        self.assertEqual((self.folder / "a.wav.bak").read_bytes(), wave())
+        self.assertEqual(path.read_bytes(), wave(chunk(b"note", b"")))
+        self.assert_no_litter("a.wav", "a.wav.bak")
+
+    def test_a_failed_edit_in_place_leaves_no_tail(self):
+        for name, content, whole in (("a.wav", wave(), wave(chunk(b"note", b"text"))),
+                                     ("a.caf", caf(), caf() + b"note" + struct.pack(">q", 4) + b"text")):
+            path = self.write(name, content)
+            for room in (4, 10, 40):  # for parts of the header, and of the body
+                limit = len(content) + room
+                self.failure("chunks", "add", name, "note", "--in-place", stdin=b"text" * 1000, preexec_fn=lambda: (
+                    resource.setrlimit(resource.RLIMIT_FSIZE, (limit, limit))))
+                self.assertEqual(path.read_bytes(), content, room)
+            self.add(name, "note", "--in-place")
+            self.assertEqual(path.read_bytes(), whole)
+
+    def test_standard_error_that_cannot_be_written_ends_no_batch(self):
+        self.write("a.wav", wave())
+        with open("/dev/full", "wb") as full:
+            result = subprocess.run([KTFILES, "info", "none", "a.wav", "none"], cwd=self.folder, stderr=full,
+                                    stdout=subprocess.PIPE)
+        self.assertEqual((result.returncode, result.stdout.count(b"a.wav")), (1, 1))
+
+    def test_a_lease_of_another_process_is_waited_for(self):
+        path = self.write("a.wav", wave())
+        holder = subprocess.Popen([sys.executable, "-c", LEASE_HOLDER, path], stdout=subprocess.PIPE)
+        if holder.stdout.readline() != b"held\n":
+            self.skipTest("this file system has no leases")
+        self.add("a.wav", "note")
+        self.assertEqual(path.read_bytes(), wave(chunk(b"note", b"text")))
+        holder.communicate(timeout=30)
 
     def test_hard_links_are_not_torn_apart(self):
         path = self.write("a.wav", wave())
@@ -191,11 +252,21 @@ class Interruptions(CommandTest):
         edit.kill()
         edit.wait(30)
         self.assertEqual(len(os.listdir(self.folder)), 2)  # nothing can be done about that one but
-        foreign = self.write(".big.wav.ktfiles-1-00000000", b"another run's, alive")
+        foreign = self.write(".big.wav.ktfiles-1", b"another run's, alive")
         with open(foreign, "r+b") as live:
             fcntl.fcntl(live, 37, struct.pack("hhqqi4x", fcntl.F_WRLCK, 0, 0, 0, 0))
             self.run_command("chunks", "add", "big.wav", "note", stdin=b"x")
         self.assert_no_litter("big.wav", foreign.name)
+
+    def test_a_name_that_is_given_away_leads_no_edit_astray(self):
+        path, edit = self.slow_edit()
+        victim = self.write("victim", wave())
+        name = self.folder / ".big.wav.ktfiles-0"
+        os.rename(name, self.folder / "moved")
+        name.symlink_to("victim")
+        self.assertIn(b"was moved by another program", edit.communicate(timeout=60)[1])
+        self.assertEqual(victim.read_bytes(), wave())
+        self.assertEqual(path.stat().st_size, len(wave()) - 200 + 200_000_000)
 
     def test_change_by_others_meanwhile(self):
         path, edit = self.slow_edit()

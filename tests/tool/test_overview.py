@@ -139,7 +139,11 @@ class Output(CommandTest):
         old = self.write("old.png", b"old")
         os.chmod(old, 0o640)
         os.symlink("old.png", self.folder / "link.png")
-        self.assertEqual(self.lines("overview", "a.wav", "--png", "link.png", "--svg", "a.svg"),
+        for out in ("link.png", "old.png"):
+            for option in ("--png", "--svg"):
+                self.assertIn("exists; --force replaces it", self.failure("overview", "a.wav", option, out))
+        self.assertEqual(old.read_bytes(), b"old")
+        self.assertEqual(self.lines("overview", "a.wav", "--png", "link.png", "--svg", "a.svg", "--force"),
                          ["a.wav: drawn to link.png, 1800 x 280", "a.wav: drawn to a.svg, 1800 x 280"])
         self.assertEqual(os.stat(old).st_mode & 0o777, 0o640)
         self.assertTrue(os.path.islink(self.folder / "link.png"))

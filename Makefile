@@ -3,7 +3,7 @@ JOBS ?= $(shell nproc)
 PREFIX ?= /usr/local
 FUZZ_SECONDS ?= 60
 
-.PHONY: all run test asan tsan stress bench fuzz install package clean
+.PHONY: all run test asan tsan check stress bench fuzz install package clean
 
 all:
 	@scripts/setup build
@@ -24,6 +24,13 @@ asan tsan:
 	@cmake --preset $@ $(CMAKE_FLAGS) >/dev/null
 	cmake --build --preset $@ -j $(JOBS)
 	ctest --preset $@
+
+# How the sources are laid out, and what clang-tidy finds in them.
+check:
+	@scripts/setup build test bench check
+	@cmake --preset test $(CMAKE_FLAGS) >/dev/null
+	find . -path ./build -prune -o -name '*.cpp' -print -o -name '*.h' -print | xargs clang-format-14 --dry-run --Werror
+	scripts/tidy build/test
 
 # 1,000 targeted and 5,000 random kills of processes that hold, wait, ask and present.
 stress:

@@ -33,6 +33,12 @@ AudioFileInfo describe(const std::string& path, bool quiet)
     if (status == kStatusParameterError || (status == kStatusOK && info.containerId == 0))
         throw Failure("no audio file known here");
     requireOK(status);
+    if (info.framesAreStated) { // by a header: the decoder, where there is one, counts
+        CAudioFileIO audio;
+        openAudio(audio, path);
+        audio.OpenDecoder();
+        return audio.Info();
+    }
     return info;
 }
 
@@ -54,10 +60,25 @@ std::string channelsText(int channels)
 std::string containerText(const AudioFileInfo& info)
 {
     static constexpr std::pair<FourCC, const char*> names[] = {
-        {kRIFF, "WAVE"},         {kCaff, "CAF"},           {kCAT, "REX2"},          {fourCC("MPG3"), "MP3"},
-        {fourCC("adts"), "AAC"}, {fourCC("M4A "), "M4A"},  {fourCC("mpg4"), "MP4"}, {fourCC("flac"), "FLAC"},
-        {fourCC("OggS"), "Ogg"}, {fourCC("wma "), "WMA"},  {fourCC("NeXT"), "AU"},  {fourCC("wvpk"), "WavPack"},
-        {fourCC("MAC "), "APE"}, {fourCC("ac-3"), "AC-3"}, {fourCC("MPG2"), "MP2"},
+        {kRIFF, "WAVE"},
+        {kCaff, "CAF"},
+        {kCAT, "REX2"},
+        {fourCC("MPG3"), "MP3"},
+        {fourCC("adts"), "AAC"},
+        {fourCC("M4A "), "M4A"},
+        {fourCC("mpg4"), "MP4"},
+        {fourCC("flac"), "FLAC"},
+        {fourCC("ogg "), "Ogg"},
+        {fourCC("asf "), "WMA"},
+        {fourCC("NeXT"), "AU"},
+        {fourCC("wvpk"), "WavPack"},
+        {fourCC("ape "), "APE"},
+        {fourCC("ac-3"), "AC-3"},
+        {fourCC("MPG2"), "MP2"},
+        {fourCC("tta "), "TTA"},
+        {fourCC("tak "), "TAK"},
+        {fourCC("W64f"), "Wave64"},
+        {fourCC("mkv "), "Matroska"},
     };
     if (info.containerId == kFORM)
         return fourCCText(info.formType);
@@ -105,6 +126,8 @@ nlohmann::ordered_json asJson(const std::string& path, const AudioFileInfo& info
                                    {"fileLength", info.fileLength},
                                    {"typeByName", typeByNameText(facts)},
                                    {"modified", dateText(facts.modified)}};
+    if (info.framesAreStated)
+        json["framesAreStated"] = true; // no decoder could count them
     if (facts.stereo) {
         json["stereoPartner"] = facts.stereo->partner;
         json["stereoPartnerExists"] = facts.stereo->partnerExists;

@@ -1,110 +1,35 @@
-// AIFF and AIFC. Published sources: Audio Interchange File Format 1.3, AIFF-C draft of 1991-08-26; the compression
-// types are those in use.
+// AIFF and AIFC. Published sources: Audio Interchange File Format 1.3, AIFF-C draft of 1991-08-26.
 #include "audiofile/ContainerDescriptions.h"
 
 #include "loops/tagging/ChunkIDs.h"
 #include "loops/tagging/Chunks.h"
-#include "platform/core/ByteReader.h"
-
-#include <cmath>
 #include <optional>
 
 namespace {
 
-using std::endian;
-
-// The compression types that are linear PCM. 0 bytes: as many as the chunk's bits need.
-struct LinearType {
-    FourCC type;
-    int bytesPerSample;
-    bool isFloat;
-    endian order;
-    bool isUnsigned = false;
-};
-constexpr std::array<LinearType, 15> kLinearTypes{{
-    {fourCC("NONE"), 0, false, endian::big},
-    {fourCC("twos"), 0, false, endian::big},
-    {fourCC("sowt"), 0, false, endian::little},
-    {fourCC("raw "), 1, false, endian::big, true},
-    {fourCC("in24"), 3, false, endian::big},
-    {fourCC("in32"), 4, false, endian::big},
-    {fourCC("42ni"), 3, false, endian::little},
-    {fourCC("42n1"), 3, false, endian::little},
-    {fourCC("ni24"), 3, false, endian::little},
-    {fourCC("23ni"), 4, false, endian::little},
-    {fourCC("ni32"), 4, false, endian::little},
-    {fourCC("fl32"), 4, true, endian::big},
-    {fourCC("FL32"), 4, true, endian::big},
-    {fourCC("fl64"), 8, true, endian::big},
-    {fourCC("FL64"), 8, true, endian::big},
-}};
-
-// Compressed types whose "COMM" counts packets.
-struct PacketType {
-    FourCC type;
-    int framesPerPacket;
-};
-constexpr std::array<PacketType, 3> kPacketTypes{{{fourCC("ima4"), 64}, {fourCC("MAC3"), 6}, {fourCC("MAC6"), 6}}};
-
-struct Common {
-    std::int16_t channels = 0;
-    std::uint32_t frames = 0;
-    std::int16_t bits = 0;
-    double rate = 0;
-    FourCC type = fourCC("NONE");
-};
-
-// An 80-bit extended float: sign, 15 bits of exponent, 64 bits of significand. What is no number gives one that is no
-// rate.
-double extendedFloat(ByteReader& reader)
+std::optional<platform::StoredFormat> readCommon(FileWindow& file, std::int64_t body, std::int64_t size, bool isAIFC)
 {
-    constexpr int bias = 16383;
-    constexpr int notANumber = 0x7FFF;
-    const auto signAndExponent = reader.read<std::uint16_t>();
-    const auto significand = reader.read<std::uint64_t>();
-    const int exponent = signAndExponent & 0x7FFF;
-    if ((signAndExponent & 0x8000) != 0 || exponent == notANumber)
-        return 0;
-    return std::ldexp(static_cast<double>(significand), exponent - bias - 63);
-}
-
-std::optional<Common> readCommon(FileWindow& file, std::int64_t body, std::int64_t size)
-{
-    constexpr std::size_t plainSize = 18;
-    std::array<std::byte, plainSize + 4> bytes{};
+    std::array<std::byte, platform::kMostOfStoredFormat> bytes{};
     const auto wanted = static_cast<std::size_t>(std::clamp<std::int64_t>(size, 0, std::int64_t{bytes.size()}));
     const std::size_t there = file.readSome(bytes.data(), body, wanted);
-    if (there < plainSize)
-        return std::nullopt;
-    ByteReader reader(bytes);
-    Common common;
-    common.channels = reader.read<std::int16_t>();
-    common.frames = reader.read<std::uint32_t>();
-    common.bits = reader.read<std::int16_t>();
-    common.rate = extendedFloat(reader);
-    if (there == bytes.size())
-        common.type = reader.readFourCC();
-    return common;
+    return platform::storedFormatOfAIFF(BytesView(bytes).first(there), isAIFC);
 }
 
-// The samples stand behind 8 bytes, and as many more as the first four of these say. An offset beyond the chunk is
-// ignored; a size that is all ones, or none in a container that ends ahead of the samples, is that of an unfinished
-// recording. Kept: sizes of 2 GiB and more are taken as they are, although they end a walk.
+// Kept: sizes of 2 GiB and more are taken as they are, although they end a walk.
 void setSoundData(FileWindow& file, const ContainerChkExtended& header, const ChkHeader& chunk, std::int64_t body,
                   AudioFileInfo& info)
 {
-    constexpr std::uint32_t fixedSize = 8;
-    const std::uint32_t stored = chunk.size;
-    const bool unfinished = stored == 0xFFFFFFFF || (stored <= fixedSize && header.EffectiveSize() <= body);
-    const std::uint32_t size = unfinished ? 0xFFFFFFFF : stored;
-    std::array<std::byte, 4> bytes{};
-    std::uint32_t offset = 0;
-    if (size >= fixedSize && file.read(bytes.data(), body, bytes.size()) == kStatusOK)
-        offset = loadBE<std::uint32_t>(bytes.data());
-    if (offset > size - std::min(size, fixedSize) || body + fixedSize + offset > file.length())
-        offset = 0;
-    const std::uint32_t skipped = std::min(size, fixedSize) + offset;
-    SetSampleData(info, body + skipped, unfinished ? UINT64_MAX : size - skipped);
+    const std::uint64_t stored = chunk.size;
+    const bool isOpen = platform::isUnfinished(platform::ContainerKind::iff, {.body = static_cast<std::uint64_t>(body),
+                                                                              .size = static_cast<std::int64_t>(stored),
+                                                                              .isOpen = stored == 0xFFFFFFFF,
+                                                                              .containerSize = header.EffectiveSize()});
+    const std::uint64_t size = isOpen ? UINT64_MAX : stored;
+    const std::uint64_t there = std::min(size, static_cast<std::uint64_t>(file.length() - body));
+    std::array<std::byte, 4> start{};
+    const std::size_t got = file.readSome(start.data(), body, start.size());
+    const std::uint64_t lead = platform::soundDataLead(there, BytesView(start).first(got));
+    SetSampleData(info, body + static_cast<std::int64_t>(lead), isOpen ? UINT64_MAX : size - lead);
 }
 
 std::optional<tagging::LoopTiming> readLoopTiming(FileWindow& file, std::int64_t body, std::int64_t size)
@@ -114,29 +39,16 @@ std::optional<tagging::LoopTiming> readLoopTiming(FileWindow& file, std::int64_t
     return there ? tagging::LoopTimingInAIFF(bytes) : std::nullopt;
 }
 
-void setFormat(const Common& common, bool isAIFC, AudioFileInfo& info)
+// Of linear PCM what the file counts, where that is there; a count of 0 with samples behind it was never filled in.
+// Packets of one size are those that are there: some writers count frames, or the packets of all channels as one.
+std::int64_t framesOf(const platform::StoredFormat& format, const AudioFileInfo& info)
 {
-    info.channels = std::max<std::int16_t>(common.channels, 0);
-    info.busFormat = AudioBusFormatForChannels(info.channels);
-    SetSampleRate(info, common.rate);
-    const FourCC type = isAIFC ? common.type : fourCC("NONE");
-    const auto linear = std::find_if(kLinearTypes.begin(), kLinearTypes.end(),
-                                     [&](const LinearType& entry) { return entry.type == type; });
-    if (linear != kLinearTypes.end()) {
-        const int fromBits = (std::max<int>(common.bits, 0) + 7) / 8;
-        SetLinearPCM(info, linear->bytesPerSample > 0 ? linear->bytesPerSample : fromBits, linear->isFloat,
-                     linear->order, linear->isUnsigned);
-        const std::int64_t there = info.bytesPerFrame > 0 ? info.dataSize / info.bytesPerFrame : 0;
-        // A count of 0 with samples behind it was never filled in.
-        info.frames = common.frames == 0 ? there : std::min<std::int64_t>(common.frames, there);
-        return;
-    }
-    info.compressed = true;
-    info.bitsPerSample = 0;
-    info.formatCode = type;
-    const auto packets = std::find_if(kPacketTypes.begin(), kPacketTypes.end(),
-                                      [&](const PacketType& entry) { return entry.type == type; });
-    info.frames = std::int64_t{common.frames} * (packets == kPacketTypes.end() ? 1 : packets->framesPerPacket);
+    const auto counted = static_cast<std::int64_t>(format.countedPackets);
+    const platform::StreamDescription& stream = format.stream;
+    if (stream.bytesPerPacket == 0)
+        return info.compressed ? counted : 0;
+    const std::int64_t there = info.dataSize / stream.bytesPerPacket;
+    return info.compressed || counted == 0 ? there * stream.framesPerPacket : std::min(counted, there);
 }
 
 } // namespace
@@ -150,24 +62,29 @@ std::int32_t DescribeAIFF(FileWindow& file, AudioFileInfo& info)
         return kStatusEndOfFile;
     info.containerId = header.id;
     info.formType = header.formType;
-    std::optional<Common> common;
+    std::optional<platform::StoredFormat> common;
+    bool hasCommon = false; // a chunk of that id, if only the start of one
     std::optional<tagging::LoopTiming> timing;
     bool hasData = false;
     VisitChunks(file, header, [&](const ChkHeader& chunk, std::int64_t body) {
-        if (chunk.id == fourCC("COMM") && !common) {
-            common = readCommon(file, body, chunk.EffectiveSize(header));
+        if (chunk.id == fourCC("COMM") && !hasCommon) {
+            hasCommon = true;
+            common = readCommon(file, body, chunk.EffectiveSize(header), header.formType == kAIFC);
         } else if (chunk.id == fourCC("SSND") && !hasData) {
             setSoundData(file, header, chunk, body, info);
             hasData = true;
         } else if (chunk.id == tagging::kBasicTagging && !timing) {
             timing = readLoopTiming(file, body, chunk.EffectiveSize(header));
         }
-        return !(common && hasData && timing);
+        return !(hasCommon && hasData && timing);
     });
     if (!common)
         return kStatusEndOfFile;
-    setFormat(*common, header.formType == kAIFC, info);
+    SetStoredFormat(info, *common);
+    info.frames = framesOf(*common, info);
+    const platform::StreamDescription& stream = common->stream;
+    info.framesAreStated = info.compressed && (stream.bytesPerPacket == 0 || stream.isLinearPCM());
     SetLoopTiming(info, timing);
     // Without frames there need be no sound data.
-    return hasData || common->frames == 0 ? kStatusOK : kStatusEndOfFile;
+    return hasData || common->countedPackets == 0 ? kStatusOK : kStatusEndOfFile;
 }

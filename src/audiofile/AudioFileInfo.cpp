@@ -25,7 +25,7 @@ std::int32_t describe(FileWindow& file, const platform::URLRef& url, AudioFileIn
     const std::size_t there = file.readSome(start.data(), 0, start.size());
     if (there >= 8 && loadBE<FourCC>(start.data()) == kCaff) {
         info.fileType = kCaff;
-        return DescribeCAF(file, info);
+        return DescribeCAF(file, url, info);
     }
     if (there >= 4 && loadBE<FourCC>(start.data()) == fourCC("fLaC"))
         return DescribeFLAC(file, info);
@@ -67,14 +67,31 @@ void SetSampleRate(AudioFileInfo& info, double rate)
     info.sampleRate = std::llround(info.exactSampleRate);
 }
 
-void SetLinearPCM(AudioFileInfo& info, int bytesPerSample, bool isFloat, std::endian order, bool isUnsigned)
+void SetStoredFormat(AudioFileInfo& info, const platform::StoredFormat& format)
 {
-    info.formatCode = fourCC("lpcm");
-    info.floatingPoint = isFloat;
-    info.bitsPerSample = bytesPerSample * 8;
-    info.sampleFormat = {info.bitsPerSample, isFloat, isUnsigned, bytesPerSample > 1 ? order : std::endian::native};
+    constexpr std::uint32_t mostChannels = 0xFFFF; // more than that is no sound but a damaged header
+    platform::StreamDescription stream = format.stream;
+    if (stream.channelsPerFrame > mostChannels)
+        stream.channelsPerFrame = stream.bytesPerFrame = 0;
+    info.channels = static_cast<std::int32_t>(stream.channelsPerFrame);
+    info.busFormat = AudioBusFormatForChannels(info.channels);
+    SetSampleRate(info, stream.sampleRate);
+    info.formatCode = format.coding;
+    const std::uint32_t bytesPerSample =
+        stream.channelsPerFrame > 0 ? stream.bytesPerFrame / stream.channelsPerFrame : 0;
+    info.sampleFormat = stream.sampleFormat();
+    info.sampleFormat.bits = static_cast<int>(bytesPerSample * 8);
+    if (bytesPerSample <= 1)
+        info.sampleFormat.order = std::endian::native;
+    info.compressed = !stream.isLinearPCM() || (bytesPerSample > 0 && !info.sampleFormat.isSupported());
+    info.bitsPerSample = info.compressed ? 0 : info.sampleFormat.bits;
+    if (info.compressed) {
+        info.sampleFormat = {};
+        return;
+    }
+    info.floatingPoint = info.sampleFormat.isFloat;
     info.byteSwapped = info.sampleFormat.order != std::endian::native;
-    info.bytesPerFrame = bytesPerSample * info.channels;
+    info.bytesPerFrame = static_cast<std::int32_t>(stream.bytesPerFrame);
 }
 
 void SetSampleData(AudioFileInfo& info, std::int64_t offset, std::uint64_t size)

@@ -53,10 +53,11 @@ struct KT_EXPORT AudioFileInfo {
                             // ".mp3", "aac ", "alac", "flac", … elsewhere
     double exactSampleRate = 44100;
     platform::SampleFormat sampleFormat; // of linear PCM
-    bool compressed = false;             // frames come from a decoder, if at all
-    std::int32_t bytesPerFrame = 0;      // of linear PCM; samples left-aligned in their containers
-    std::int64_t dataSize = 0;           // sample bytes that are in the file
-    std::int64_t missingDataSize = 0;    // sample bytes that the header promises and the file ends ahead of
+    bool compressed = false;             // frames come from a decoder, if at all; so do integers of 64 bits
+    bool framesAreStated = false;     // of compressed data: by a header alone, which CAudioFileIO::OpenDecoder proves
+    std::int32_t bytesPerFrame = 0;   // of linear PCM; samples left-aligned in their containers
+    std::int64_t dataSize = 0;        // sample bytes that are in the file
+    std::int64_t missingDataSize = 0; // sample bytes that the header promises and the file ends ahead of
     TAudioBusFormat busFormat = kAudioBusUndefined;
 
     bool IsLinearPCM() const { return !compressed && bytesPerFrame > 0 && sampleFormat.isSupported(); }
@@ -71,7 +72,7 @@ struct KT_EXPORT AudioFileInfo {
 /// Compressed files outside the containers, MP3, AAC and M4A, are opened a second time by their path, and so not known
 /// in memory; what only the decoder module could describe is "fmt?" where it does not (platform/ConvertingReader.h says
 /// what to install). Of compressed data rate, channels and frames are what the file says, except for `bitsPerSample` 0
-/// and `dataOffset` 0; CAudioFileIO::OpenDecoder tells what the decoder finds.
+/// and `dataOffset` 0: the number of frames is that which decoding gives, unless `framesAreStated`.
 KT_EXPORT std::int32_t GetAudioFileInfo(CFileIO& file, unsigned int permission, AudioFileInfo& info);
 
 /// Channels of a bus format; 0 for values outside 1 to 14.

@@ -1,27 +1,17 @@
-// CAF. Published source: the published format description, version 1.0.
+// CAF. Published source: its format description, version 1.0.
 #include "audiofile/BusFormats.h"
 #include "audiofile/ContainerDescriptions.h"
 #include "audiofile/ContainerWalk.h"
 
 #include "loops/tagging/ChunkIDs.h"
 #include "platform/core/ByteReader.h"
+#include "platform/packets/PacketSource.h"
 
 #include <optional>
 
 namespace {
 
-constexpr FourCC kLinearPCM = fourCC("lpcm");
 constexpr std::int64_t kEditCountSize = 4;
-
-struct Description {
-    double rate = 0;
-    FourCC format = 0;
-    std::uint32_t flags = 0; // of linear PCM: 1 floats, 2 little-endian
-    std::uint32_t bytesPerPacket = 0;
-    std::uint32_t framesPerPacket = 0;
-    std::uint32_t channels = 0;
-    std::uint32_t bits = 0;
-};
 
 struct PacketTable {
     std::int64_t packets = 0;
@@ -29,28 +19,19 @@ struct PacketTable {
 };
 
 struct Chunks {
-    std::optional<Description> description;
+    std::optional<platform::StoredFormat> format;
+    bool hasDescription = false; // a chunk of that id, if only the start of one
     std::optional<PacketTable> packetTable;
     std::optional<tagging::LoopTiming> timing;
     std::uint32_t speakers = 0;
     bool hasData = false;
 };
 
-std::optional<Description> readDescription(FileWindow& file, std::int64_t body)
+std::optional<platform::StoredFormat> readDescription(FileWindow& file, std::int64_t body, std::int64_t size)
 {
-    std::array<std::byte, 32> bytes;
-    if (file.read(bytes.data(), body, bytes.size()) != kStatusOK)
-        return std::nullopt;
-    ByteReader reader(bytes);
-    Description description;
-    description.rate = reader.read<double>();
-    description.format = reader.readFourCC();
-    description.flags = reader.read<std::uint32_t>();
-    description.bytesPerPacket = reader.read<std::uint32_t>();
-    description.framesPerPacket = reader.read<std::uint32_t>();
-    description.channels = reader.read<std::uint32_t>();
-    description.bits = reader.read<std::uint32_t>();
-    return description;
+    std::array<std::byte, platform::kMostOfStoredFormat> bytes;
+    const auto wanted = static_cast<std::size_t>(std::clamp<std::int64_t>(size, 0, std::int64_t{bytes.size()}));
+    return platform::storedFormatOfCAF(BytesView(bytes).first(file.readSome(bytes.data(), body, wanted)));
 }
 
 std::optional<PacketTable> readPacketTable(FileWindow& file, std::int64_t body)
@@ -92,14 +73,15 @@ std::optional<tagging::LoopTiming> readLoopTiming(FileWindow& file, std::int64_t
 // Whether there is nothing more to look for: a packet table may stand behind the data that it tells of.
 bool isComplete(const Chunks& chunks)
 {
-    return chunks.timing && chunks.description && chunks.hasData &&
-           (chunks.description->format == kLinearPCM || chunks.packetTable);
+    return chunks.timing && chunks.hasDescription && chunks.hasData &&
+           (!chunks.format || chunks.format->stream.isLinearPCM() || chunks.packetTable);
 }
 
 void readChunk(FileWindow& file, FourCC id, std::int64_t body, std::int64_t size, Chunks& chunks, AudioFileInfo& info)
 {
-    if (id == fourCC("desc") && !chunks.description) {
-        chunks.description = readDescription(file, body);
+    if (id == fourCC("desc") && !chunks.hasDescription) {
+        chunks.hasDescription = true;
+        chunks.format = readDescription(file, body, size);
     } else if (id == fourCC("pakt") && !chunks.packetTable) {
         chunks.packetTable = readPacketTable(file, body);
     } else if (id == fourCC("chan")) {
@@ -107,8 +89,8 @@ void readChunk(FileWindow& file, FourCC id, std::int64_t body, std::int64_t size
     } else if (id == kUuid && !chunks.timing) {
         chunks.timing = readLoopTiming(file, body, size);
     } else if (id == kData && !chunks.hasData) {
-        // -1, and in a file that was never finished 0: to the end of the file.
-        const std::int64_t samples = size > 0 ? std::max<std::int64_t>(size - kEditCountSize, 0) : INT64_MAX;
+        const bool isOpen = platform::isUnfinished(platform::ContainerKind::caf, {.size = size});
+        const std::int64_t samples = isOpen ? INT64_MAX : std::max<std::int64_t>(size - kEditCountSize, 0);
         SetSampleData(info, body + kEditCountSize, static_cast<std::uint64_t>(samples));
         chunks.hasData = true;
     }
@@ -124,20 +106,8 @@ Chunks readChunks(FileWindow& file, AudioFileInfo& info)
     return chunks;
 }
 
-void setLinear(const Description& description, AudioFileInfo& info)
-{
-    const bool isFloat = (description.flags & 1) != 0;
-    const std::endian order = (description.flags & 2) != 0 ? std::endian::little : std::endian::big;
-    const std::uint32_t fromBits = description.bits / 8 + (description.bits % 8 != 0 ? 1 : 0);
-    const bool divides = description.channels > 0 && description.bytesPerPacket % description.channels == 0;
-    const std::uint32_t fromPacket = divides ? description.bytesPerPacket / description.channels : 0;
-    const std::uint32_t bytes = fromPacket >= fromBits && fromPacket > 0 ? fromPacket : fromBits;
-    SetLinearPCM(info, static_cast<int>(std::min<std::uint32_t>(bytes, 9)), isFloat, order);
-    info.frames = info.bytesPerFrame > 0 ? info.dataSize / info.bytesPerFrame : 0;
-}
-
 // Frames of compressed data: no more than the packets hold that can be there, each of a byte at least.
-std::int64_t compressedFrames(const Description& description, const std::optional<PacketTable>& table,
+std::int64_t compressedFrames(const platform::StreamDescription& description, const std::optional<PacketTable>& table,
                               const AudioFileInfo& info)
 {
     const std::int64_t packetsThere = info.dataSize / std::max<std::int64_t>(description.bytesPerPacket, 1);
@@ -151,27 +121,36 @@ std::int64_t compressedFrames(const Description& description, const std::optiona
     return description.bytesPerPacket > 0 && framesPerPacket > 0 ? capacity : 0;
 }
 
+// What the packets hold that are there, where the library finds them.
+void setCompressedFrames(const platform::URLRef& url, const Chunks& chunks, AudioFileInfo& info)
+{
+    std::int32_t status = kStatusParameterError;
+    const auto packets = url ? platform::openPacketSource(url->posixPath(), &status) : nullptr;
+    info.framesAreStated = !packets;
+    if (!packets) {
+        info.frames = compressedFrames(chunks.format->stream, chunks.packetTable, info);
+        return;
+    }
+    SetSampleRate(info, packets->format().sampleRate);
+    info.channels = static_cast<std::int32_t>(packets->format().channelsPerFrame);
+    info.busFormat = BusFormatOf(chunks.speakers, info.channels);
+    info.frames = packets->table().validFrames;
+}
+
 } // namespace
 
-std::int32_t DescribeCAF(FileWindow& file, AudioFileInfo& info)
+std::int32_t DescribeCAF(FileWindow& file, const platform::URLRef& url, AudioFileInfo& info)
 {
-    constexpr std::uint32_t mostChannels = 65536; // more than that is no sound but a damaged header
     info.containerId = kCaff;
     const Chunks chunks = readChunks(file, info);
-    if (!chunks.description)
+    if (!chunks.format)
         return kStatusEndOfFile;
-    const Description& description = *chunks.description;
-    info.channels = description.channels <= mostChannels ? static_cast<int>(description.channels) : 0;
+    SetStoredFormat(info, *chunks.format);
     info.busFormat = BusFormatOf(chunks.speakers, info.channels);
-    SetSampleRate(info, description.rate);
-    if (description.format == kLinearPCM) {
-        setLinear(description, info);
-    } else {
-        info.compressed = true;
-        info.bitsPerSample = 0;
-        info.formatCode = description.format;
-        info.frames = compressedFrames(description, chunks.packetTable, info);
-    }
+    if (info.compressed)
+        setCompressedFrames(url, chunks, info);
+    else
+        info.frames = info.bytesPerFrame > 0 ? info.dataSize / info.bytesPerFrame : 0;
     SetLoopTiming(info, chunks.timing);
     return chunks.hasData ? kStatusOK : kStatusEndOfFile;
 }

@@ -3,6 +3,7 @@
 
 #include "platform/CompressedAudio.h"
 #include "platform/core/ByteReader.h"
+#include "platform/packets/FLACEnd.h"
 
 #include <algorithm>
 #include <limits>
@@ -24,6 +25,16 @@ void setCompressed(AudioFileInfo& info, FourCC fileType, FourCC format, double r
     info.frames = static_cast<std::int64_t>(std::min(frames, most));
 }
 
+/// As many as a frame has at most, where the file says so.
+Bytes lastBytes(FileWindow& file, std::uint32_t largestFrame)
+{
+    constexpr std::uint32_t usual = 1 << 15, most = 1 << 18;
+    const auto wanted = std::int64_t{std::min(largestFrame == 0 ? usual : largestFrame, most)};
+    Bytes bytes(static_cast<std::size_t>(std::min(wanted, file.length())));
+    bytes.resize(file.readPieces(bytes.data(), file.length() - static_cast<std::int64_t>(bytes.size()), bytes.size()));
+    return bytes;
+}
+
 } // namespace
 
 std::int32_t DescribeFLAC(FileWindow& file, AudioFileInfo& info)
@@ -36,12 +47,15 @@ std::int32_t DescribeFLAC(FileWindow& file, AudioFileInfo& info)
         setCompressed(info, fourCC("flac"), fourCC("flac"), 0, 0, 0);
         return kStatusEndOfFile;
     }
-    const std::uint64_t mostInBlock = loadBE<std::uint16_t>(bytes.data());
+    const std::uint32_t mostInBlock = loadBE<std::uint16_t>(bytes.data());
     // Bits: 20 rate, 3 channels - 1, 5 of a sample - 1, 36 frames.
     const auto properties = loadBE<std::uint64_t>(bytes.data() + 8);
     const std::uint64_t capacity = static_cast<std::uint64_t>(info.fileLength) / smallestBlock * mostInBlock;
+    const std::uint64_t stated = properties & 0xFFFFFFFFF;
     setCompressed(info, fourCC("flac"), fourCC("flac"), static_cast<double>(properties >> 44),
-                  static_cast<std::uint32_t>(properties >> 41 & 7) + 1, std::min(properties & 0xFFFFFFFFF, capacity));
+                  static_cast<std::uint32_t>(properties >> 41 & 7) + 1, std::min(stated, capacity));
+    const std::uint32_t largestFrame = loadBE<std::uint32_t>(bytes.data() + 4) & 0xFFFFFF;
+    info.framesAreStated = stated == 0 || !platform::flacEndsAt(lastBytes(file, largestFrame), stated, mostInBlock);
     return kStatusOK;
 }
 

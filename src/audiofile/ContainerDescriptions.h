@@ -5,6 +5,7 @@
 #include "audiofile/ChunkWalk.h"
 #include "audiofile/FileWindow.h"
 #include "loops/tagging/LoopTiming.h"
+#include "platform/audio/StoredFormat.h"
 
 #include <cstdint>
 #include <functional>
@@ -18,7 +19,7 @@ std::int32_t DescribeAudioFile(FileWindow& file, const platform::URLRef& url, Au
 // kind cannot do without is missing.
 std::int32_t DescribeWAVE(FileWindow& file, AudioFileInfo& info);
 std::int32_t DescribeAIFF(FileWindow& file, AudioFileInfo& info);
-std::int32_t DescribeCAF(FileWindow& file, AudioFileInfo& info);
+std::int32_t DescribeCAF(FileWindow& file, const platform::URLRef& url, AudioFileInfo& info);
 std::int32_t DescribeFLAC(FileWindow& file, AudioFileInfo& info);
 /// A file in none of these containers, which begins with `start`; as platform::describeCompressedAudio.
 std::int32_t DescribeCompressed(const platform::URL& url, BytesView start, AudioFileInfo& info);
@@ -28,8 +29,8 @@ FourCC HostFileType(FourCC type);
 
 /// Sets the sample rate: as it is, and rounded. What is no rate (NaN, infinite, negative, beyond 2^53) gives 0.
 void SetSampleRate(AudioFileInfo& info, double rate);
-/// Sets the fields of linear PCM that stands in containers of `bytesPerSample` bytes, left-aligned.
-void SetLinearPCM(AudioFileInfo& info, int bytesPerSample, bool isFloat, std::endian order, bool isUnsigned = false);
+/// Sets channels, rate and coding; of linear PCM also how its samples stand, left-aligned in their bytes.
+void SetStoredFormat(AudioFileInfo& info, const platform::StoredFormat& format);
 /// Sets the sample data: `size` bytes at `offset`, of which those beyond the end of the file are not counted.
 void SetSampleData(AudioFileInfo& info, std::int64_t offset, std::uint64_t size);
 /// Sets the loop fields, behind all others.

@@ -15,10 +15,10 @@ struct CompressedAudio {
     std::uint64_t frames = 0;
 };
 
-/// `start` are the file's first bytes, 16 where it has so many. MP3, AAC and M4A are described without the decoder
-/// module, which is loaded for none but files that begin as one of its kinds does. kStatusParameterError for a file
-/// that is none of these; AudioHandle::kFormatNotSupported, with `audio.fileType` set, for one that the module does not
-/// decode, or would and is not there.
+/// `start` are the file's first bytes, 16 where it has so many. MP3, AAC of more than 24 kHz and M4A are described
+/// without the decoder module, which is loaded for none but files that begin as one of its kinds does.
+/// kStatusParameterError for a file that is none of these; AudioHandle::kFormatNotSupported, with `audio.fileType` set,
+/// for one that the module does not decode, or would and is not there.
 std::int32_t describeCompressedAudio(const URL& url, BytesView start, CompressedAudio& audio);
 
 } // namespace platform

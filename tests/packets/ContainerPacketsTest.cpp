@@ -52,8 +52,9 @@ Bytes box(std::string_view type, BytesView body)
     return out.take();
 }
 
-/// Puts the tag that players know into the movie box, which must be the file's last, in place of its other tags.
-void addGaplessItem(Bytes& file, std::string_view value)
+/// Puts a gapless item into the movie box, which must be the file's last, in place of its other tags, and mostly of its
+/// edits.
+void addGaplessItem(Bytes& file, std::string_view value, std::string_view name = "exampleSMPB", bool keepsEdits = false)
 {
     const auto field = [](std::string_view type, std::size_t zeros, std::string_view content) {
         ByteWriter body;
@@ -63,13 +64,15 @@ void addGaplessItem(Bytes& file, std::string_view value)
     };
     ByteWriter item;
     item.write(field("mean", 4, "com.example"));
-    item.write(field("name", 4, "testSMPB"));
+    item.write(field("name", 4, name));
     item.write(field("data", 8, value));
     ByteWriter meta;
     meta.writeZeros(4);
     meta.write(box("ilst", box("----", item.view())));
     const Bytes userData = box("udta", box("meta", meta.view()));
     rename(file, "udta", "free");
+    if (!keepsEdits)
+        rename(file, "edts", "free");
     const std::size_t movie = bodyOf(file, "moov") - 8;
     file.insert(file.end(), userData.begin(), userData.end());
     storeBE(file.data() + movie, static_cast<std::uint32_t>(file.size() - movie));
@@ -152,6 +155,8 @@ long peakMemory()
 // Offsets are those of a box's fields: ISO/IEC 14496-12.
 TEST(ContainerPackets, ofMP4AreTakenOnlyWhenTheyAreCountedExactly)
 {
+    // 21 packets of 1,024 frames, of which 2,112 are priming and 192 fill the last one.
+    constexpr std::string_view fitting = " 00000000 00000840 000000C0 0000000000004B00 00000000 00000000";
     const struct {
         const char* name;
         std::function<void(Bytes&)> change;
@@ -165,12 +170,20 @@ TEST(ContainerPackets, ofMP4AreTakenOnlyWhenTheyAreCountedExactly)
         {"an edit behind the end", [](Bytes& file) { put(file, "elst", 12, 99999); }, 0, 0, 99999},
         {"an edit of silence", [](Bytes& file) { put(file, "elst", 12, -1); }, kOther},
         {"no edits", [](Bytes& file) { rename(file, "edts", "free"); }, 0, 21024, 0},
-        {"a tag for players",
-         [](Bytes& file) { addGaplessItem(file, " 00000000 00000840 000000C0 0000000000004B00 00000000"); }, 0, 0x4B00,
+        {"a gapless item", [&](Bytes& file) { addGaplessItem(file, fitting); }, 0, 0x4B00, 0x840},
+        {"of a last packet that is short",
+         [](Bytes& file) { addGaplessItem(file, " 00000000 00000840 00000000 0000000000004B00 00000000"); }, 0, 0x4B00,
          0x840},
-        {"a tag that does not fit",
-         [](Bytes& file) { addGaplessItem(file, " 00000000 00000840 00000123 0000000000014BCD 00000000"); }, 0, 20000,
+        {"of another name", [&](Bytes& file) { addGaplessItem(file, fitting, "exampleSMPBs"); }, 0, 21024, 0},
+        {"beside an edit list", [&](Bytes& file) { addGaplessItem(file, fitting, "exampleSMPB", true); }, 0, 20000,
          1024},
+        {"that says too much",
+         [](Bytes& file) { addGaplessItem(file, " 00000000 00000840 00000123 0000000000014BCD 00000000"); }, 0, 21024,
+         0},
+        {"that says too little",
+         [](Bytes& file) { addGaplessItem(file, " 00000000 00000840 00000000 0000000000004000 00000000"); }, 0, 21024,
+         0},
+        {"that is no number", [](Bytes& file) { addGaplessItem(file, "gapless"); }, 0, 21024, 0},
         {"another timescale", [](Bytes& file) { put(file, "mdhd", 12, 48000); }, kOther},
         {"packets of differing duration", [](Bytes& file) { put(file, "stts", 12, 1000); }, kOther},
         {"fewer durations than packets", [](Bytes& file) { put(file, "stts", 4, 1); }, kStatusIOError},

@@ -1,5 +1,6 @@
 #include "platform/audio/ChunkScanner.h"
 
+#include "platform/audio/StoredFormat.h"
 #include "platform/core/Packed.h"
 #include "platform/core/Status.h"
 
@@ -57,7 +58,10 @@ private:
         layout_.fileType = loadBE<FourCC>(start + 8);
         if (id == fourCC("FORM")) {
             layout_.kind = ContainerKind::iff;
-            return layout_.fileType == fourCC("AIFF") || layout_.fileType == fourCC("AIFC");
+            const bool isOne = layout_.fileType >> 8 == fourCC("AIFF") >> 8; // Kept: the last character may be any
+            if (isOne && layout_.fileType != fourCC("AIFC"))
+                layout_.fileType = fourCC("AIFF");
+            return isOne;
         }
         layout_.kind = ContainerKind::riff;
         return (id == fourCC("RIFF") || id == fourCC("RF64") || id == fourCC("BW64")) &&
@@ -95,34 +99,45 @@ private:
         return field;
     }
 
-    /// Where the container says that it ends; a size that was never filled in means the end of the file.
-    std::uint64_t statedEnd()
+    /// What the container says of its size; 0 when that is open.
+    std::int64_t statedSize()
     {
         const std::byte* start = reader_.at(0, 12);
         if (start == nullptr)
             return 0;
         const auto field = load<std::uint32_t>(start + 4, layout_.order());
-        std::uint64_t size = field;
-        if (field == kSizeIs64Bit)
-            size = layout_.hasSizes64 ? sizes64_.riffSize : 0;
-        return size == 0 || size > layout_.fileLength || size + 8 > layout_.fileLength ? layout_.fileLength : size + 8;
+        if (field == kSizeIs64Bit && layout_.kind == ContainerKind::riff)
+            return layout_.hasSizes64 ? static_cast<std::int64_t>(sizes64_.riffSize) : 0;
+        return layout_.kind == ContainerKind::iff ? std::int64_t{static_cast<std::int32_t>(field)}
+                                                  : std::int64_t{field};
     }
 
     void walk()
     {
         const std::byte* start = reader_.at(0, 12);
         readSizes64(start != nullptr ? loadBE<FourCC>(start) : 0);
-        const std::uint64_t limit = statedEnd();
+        const std::int64_t stated = statedSize();
+        const auto length = static_cast<std::int64_t>(layout_.fileLength);
+        // A size that was never filled in means the end of the file.
+        const auto limit = static_cast<std::uint64_t>(stated <= 0 || stated > length - 8 ? length : stated + 8);
         layout_.end = 12;
-        while (layout_.end + 8 <= limit) {
+        while (layout_.end + 8 <= limit || isAheadOfSamples()) {
             const std::byte* header = reader_.at(layout_.end, 8);
             if (header == nullptr) {
                 layout_.isBroken = true; // the file became shorter meanwhile
                 return;
             }
+            if (layout_.end + 8 > limit)
+                layout_.isBroken = true; // the container is longer than it says
             const auto id = loadBE<FourCC>(header);
             const auto field = load<std::uint32_t>(header + 4, layout_.order());
-            if (!append(id, effectiveSize(id, field)))
+            std::uint64_t size = effectiveSize(id, field);
+            if (meetsSamples(id))
+                size = sizeOfSamples({.body = layout_.end + 8,
+                                      .size = static_cast<std::int64_t>(size),
+                                      .isOpen = field == kSizeIs64Bit && !layout_.hasSizes64,
+                                      .containerSize = stated});
+            if (!append(id, size))
                 return;
             Chunk& chunk = layout_.chunks.back();
             // Kept: some writers leave the pad byte out. A byte that is not zero begins the next header.
@@ -134,18 +149,44 @@ private:
         }
     }
 
+    /// Samples are looked for beyond the end that the container states, too: there are readers that never look at it.
+    bool isAheadOfSamples() const { return !layout_.hasSamples && layout_.end + 8 <= layout_.fileLength; }
+
+    /// Whether this is the chunk of samples: the first of its id.
+    bool meetsSamples(FourCC id)
+    {
+        const bool isFirst = id == layout_.audioDataId() && !layout_.hasSamples;
+        layout_.hasSamples = layout_.hasSamples || isFirst;
+        return isFirst;
+    }
+
+    /// Those of an unfinished recording go on to the end of the file. Nothing is put behind samples that a size of none
+    /// hides: whoever goes by the sizes would not find the way to it.
+    std::uint64_t sizeOfSamples(const SoundChunk& chunk)
+    {
+        const auto stated = static_cast<std::uint64_t>(chunk.size);
+        const std::uint64_t there = layout_.fileLength - chunk.body;
+        if (!isUnfinished(layout_.kind, chunk) || stated == there)
+            return stated;
+        layout_.isBroken = layout_.isBroken || stated < there;
+        return UINT64_MAX; // becomes what is there
+    }
+
     void walkCAF()
     {
         layout_.end = 8;
         while (layout_.end + 12 <= layout_.fileLength) {
             const std::byte* header = reader_.at(layout_.end, 12);
             const auto id = header != nullptr ? loadBE<FourCC>(header) : 0;
-            const auto size = header != nullptr ? loadBE<std::int64_t>(header + 4) : std::int64_t{-1};
-            if (size < 0 && !(size == -1 && id == fourCC("data"))) {
+            const auto stated = header != nullptr ? loadBE<std::int64_t>(header + 4) : std::int64_t{-1};
+            const bool isSound = meetsSamples(id);
+            if (stated < 0 && !isSound) {
                 layout_.isBroken = true;
                 return;
             }
-            if (!append(id, static_cast<std::uint64_t>(size))) // -1 becomes a size beyond every file
+            const std::uint64_t size = isSound ? sizeOfSamples({.body = layout_.end + 12, .size = stated})
+                                               : static_cast<std::uint64_t>(stated);
+            if (!append(id, size))
                 return;
             layout_.end = layout_.nextOf(layout_.chunks.back());
         }

@@ -35,6 +35,7 @@ struct ContainerLayout {
     std::uint64_t fileLength = 0;
     std::uint64_t end = 0;       // behind the last chunk: where one more would stand
     bool isBroken = false;       // the scan met bytes that are no chunk: nothing may be put behind the last one
+    bool hasSamples = false;     // the chunk of samples is among them
     bool hasSizes64 = false;     // the first chunk is a "ds64" that counts
     bool hasReservation = false; // the first chunk is a "JUNK" that can become a "ds64"
 

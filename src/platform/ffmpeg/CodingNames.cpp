@@ -73,16 +73,16 @@ constexpr FileName files[] = {
     {"ape", fourCC("ape ")},
     {"wv", fourCC("wvpk")},
     {"tta", fourCC("tta ")},
+    {"tak", fourCC("tak ")},
     {"mpegts", fourCC("MPGT")},
     {"mov,mp4,m4a,3gp,3g2,mj2", fourCC("mp4f")},
     {"matroska,webm", fourCC("mkv ")},
 };
 
-/// Four characters of FFmpeg's name, for codings that have no name elsewhere.
-FourCC nameOf(AVCodecID codec)
+/// Four characters of FFmpeg's name, for what has no name elsewhere.
+FourCC nameOf(std::string_view full)
 {
     char name[4] = {' ', ' ', ' ', ' '};
-    const std::string_view full = avcodec_get_name(codec);
     std::copy_n(full.begin(), std::min<std::size_t>(full.size(), sizeof name), name);
     return fourCC(name[0], name[1], name[2], name[3]);
 }
@@ -152,7 +152,7 @@ StreamDescription fileFormatOf(const AVCodecParameters& parameters, int sourceBi
     const std::uint32_t tag = parameters.codec_tag;
     format.formatId = named != std::end(codings) ? named->formatId
                       : tag > 0 && tag <= 0xFFFF ? fourCC('m', 's', 0, 0) | tag
-                                                 : nameOf(parameters.codec_id);
+                                                 : nameOf(avcodec_get_name(parameters.codec_id));
     const int block = parameters.block_align;
     if (const std::uint64_t frames = block > 0 ? framesOfBlocks(parameters, block) : 0) {
         format.bytesPerPacket = static_cast<std::uint32_t>(block);
@@ -173,7 +173,7 @@ FourCC fileTypeOf(std::string_view demuxer, std::string_view brand)
         return fourCC("m4af");
     const auto* found =
         std::find_if(std::begin(files), std::end(files), [&](const FileName& file) { return file.demuxer == demuxer; });
-    return found != std::end(files) ? found->type : 0;
+    return found != std::end(files) ? found->type : nameOf(demuxer);
 }
 
 } // namespace platform::ffmpeg

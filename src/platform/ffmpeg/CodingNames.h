@@ -20,8 +20,8 @@ StreamDescription fileFormatOf(const AVCodecParameters& parameters, int sourceBi
 /// other; else 0.
 std::uint64_t framesOfBlocks(const AVCodecParameters& parameters, int bytes);
 
-/// "flac", "WAVE", …, after the name of a demultiplexer and, in movies, the brand; 0 for files that have no name
-/// elsewhere.
+/// "flac", "WAVE", …, after the name of a demultiplexer and, in movies, the brand; four characters of the
+/// demultiplexer's name for files that have no name elsewhere.
 FourCC fileTypeOf(std::string_view demuxer, std::string_view brand);
 
 /// The demultiplexers that may be used, apart by commas: files of sound or of pictures with sound, which name no other

@@ -135,7 +135,8 @@ std::int32_t FileDecoder::describeAsDecoded()
         fileFormatOf(parameters, codec_->sourceBits(), frames->sampleRate, frames->channelsPerFrame);
     if (numbers_ == Numbers::byTime && decoded().sample_rate != parameters.sample_rate)
         numbers_ = Numbers::byCount;
-    const FourCC fileType = fileTypeOf(demuxer_.name(), demuxer_.brand());
+    const bool isLayerII = parameters.codec_id == AV_CODEC_ID_MP2 && std::string_view(demuxer_.name()) == "mp3";
+    const FourCC fileType = isLayerII ? fourCC("MPG2") : fileTypeOf(demuxer_.name(), demuxer_.brand());
     std::uint64_t count = 0;
     if (status = countFrames(count); status != kStatusOK)
         return status;
@@ -194,6 +195,14 @@ std::int32_t FileDecoder::decodeRest(std::uint64_t& end)
             return kStatusOK;
         end = std::max(end, span.end);
     }
+}
+
+/// The time of number 0, by the first frame that decodes. In a FLAC file that states its length times count from the
+/// first sample, whether its frame decodes or not.
+std::int64_t FileDecoder::startOf(const AVFrame& frame) const
+{
+    const bool countsFromZero = demuxer_.name() == "flac" && frame.pts < demuxer_.stream().duration;
+    return countsFromZero ? 0 : frame.pts - static_cast<std::int64_t>(expected_);
 }
 
 // Seeking.
@@ -306,7 +315,7 @@ std::int32_t FileDecoder::decodeNext(Span& span)
             const AVFrame& frame = decoded();
             const bool isTold = tellsNumber(frame);
             if (isTold && numbers_ == Numbers::byTime && base_ == AV_NOPTS_VALUE)
-                base_ = frame.pts - static_cast<std::int64_t>(expected_);
+                base_ = startOf(frame);
             const std::int64_t origin = numbers_ == Numbers::byTime ? base_ : 0;
             const std::uint64_t told = static_cast<std::uint64_t>(frame.pts) - static_cast<std::uint64_t>(origin);
             if (isTold && (frame.pts < origin || told >= std::min(limit_, kMostFrames)))

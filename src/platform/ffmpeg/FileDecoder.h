@@ -30,6 +30,7 @@ private:
     std::int32_t countFrames(std::uint64_t& count);
     std::int32_t countFromStart(std::uint64_t& count);
     std::int32_t decodeRest(std::uint64_t& end);
+    std::int64_t startOf(const AVFrame& frame) const;
     std::int32_t restart();
     bool canLand() const;
     std::int64_t timeOf(std::uint64_t number) const;

@@ -67,14 +67,14 @@ std::optional<GaplessItem> readGaplessItem(PacketFile& file, const MP4Box& movie
         return {};
     MP4Boxes list(file, *items);
     while (const auto item = list.find(fourCC("----"))) {
-        const BytesView name = bodyOf(file, MP4Boxes(file, *item).find(fourCC("name")), 64);
-        if (!textOf(name).ends_with("SMPB"))
+        const BytesView name = bodyOf(file, MP4Boxes(file, *item).find(fourCC("name")), 256);
+        if (name.size() < kVersionSize || !textOf(name.subspan(kVersionSize)).ends_with("SMPB"))
             continue;
         const BytesView data = bodyOf(file, MP4Boxes(file, *item).find(fourCC("data")), 256);
         std::array<std::uint64_t, 4> numbers{}; // 0, priming, remainder, valid frames, …
         if (data.size() < 8 || !readNumbers(textOf(data.subspan(8)), numbers) || numbers[1] > INT32_MAX ||
             numbers[2] > INT32_MAX)
-            return {};
+            continue;
         return GaplessItem{.priming = static_cast<std::uint32_t>(numbers[1]),
                            .remainder = static_cast<std::uint32_t>(numbers[2]),
                            .validFrames = numbers[3]};

@@ -1,5 +1,5 @@
 // Which part of an MP4 file's frames is the sound: what its edit list says (ISO/IEC 14496-12, 8.6.6), and the gapless
-// value among its tags, whose name ends in "SMPB".
+// item among its tags: a freeform item ("----") whose name ends in "SMPB".
 #pragma once
 
 #include "platform/packets/MP4Boxes.h"
@@ -24,7 +24,8 @@ struct GaplessItem {
     std::uint64_t validFrames = 0;
 };
 
-/// None when the movie has no such item, or one that is not understood.
+/// None when the movie has no gapless item that is understood. Its value is text: hexadecimal numbers behind spaces, of
+/// which the second, third and fourth are these.
 std::optional<GaplessItem> readGaplessItem(PacketFile& file, const MP4Box& movie);
 
 } // namespace platform

@@ -160,7 +160,8 @@ std::int32_t M4APackets::makeTable(const MP4Box& movie, const Track& track)
     TrackFrames frames;
     frames.inPackets = samples_.packets.count() * format_.framesPerPacket;
     frames.stated = std::min(samples_.totalDuration(), frames.inPackets);
-    frames.isWhole = samples_.packets.count() == samples_.statedPackets;
+    frames.inListed = samples_.statedPackets * format_.framesPerPacket;
+    frames.perPacket = format_.framesPerPacket;
     frames.sampleRate = track.timescale;
     frames.movieTimescale = timescaleOf(*file_, MP4Boxes(*file_, movie).find(fourCC("mvhd")));
     frames.gapless = readGaplessItem(*file_, movie);

@@ -21,6 +21,15 @@ std::uint64_t heardFrames(const TrackFrames& frames, std::uint64_t duration, std
     return heard + unit + 1 >= static_cast<double>(rest) ? rest : static_cast<std::uint64_t>(std::llround(heard));
 }
 
+/// Whether the numbers add up to the packets that the file lists; the last of them may have fewer frames.
+bool fits(const GaplessItem& item, const TrackFrames& frames)
+{
+    const std::uint64_t around = std::uint64_t{item.priming} + item.remainder;
+    if (item.validFrames > frames.inListed || around > frames.inListed - item.validFrames)
+        return false;
+    return frames.inListed - item.validFrames - around < frames.perPacket;
+}
+
 } // namespace
 
 std::int32_t makePacketTable(std::uint64_t inPackets, std::uint64_t priming, std::uint64_t valid, PacketTable& table)
@@ -40,13 +49,8 @@ std::int32_t makePacketTable(std::uint64_t inPackets, std::uint64_t priming, std
 
 std::int32_t makePacketTable(const TrackFrames& frames, PacketTable& table)
 {
-    // The gapless value counts frames; an edit list counts units that may be coarser. Taken when it fits the packets.
-    if (const auto& item = frames.gapless) {
-        const std::uint64_t around = std::uint64_t{item->priming} + item->remainder;
-        const bool fits = item->validFrames <= frames.inPackets && around <= frames.inPackets - item->validFrames;
-        if (fits || !frames.isWhole)
-            return makePacketTable(frames.inPackets, item->priming, item->validFrames, table);
-    }
+    if (frames.gapless && !frames.edit && fits(*frames.gapless, frames))
+        return makePacketTable(frames.inPackets, frames.gapless->priming, frames.gapless->validFrames, table);
     const std::uint64_t start = frames.edit ? frames.edit->start : 0;
     const std::uint64_t rest = frames.stated - std::min(start, frames.stated);
     return makePacketTable(frames.inPackets, start, heardFrames(frames, frames.edit ? frames.edit->duration : 0, rest),

@@ -12,7 +12,8 @@ namespace platform {
 struct TrackFrames {
     std::uint64_t inPackets = 0; // in all packets that are there
     std::uint64_t stated = 0;    // of these, by the durations that the track states
-    bool isWhole = true;         // no packet is missing
+    std::uint64_t inListed = 0;  // in all packets that the file lists, also those that it has lost
+    std::uint32_t perPacket = 0;
     std::uint32_t sampleRate = 0;
     std::uint32_t movieTimescale = 0; // units in a second
     std::optional<MP4Edit> edit;

@@ -67,7 +67,7 @@ _ktfiles()
             project/backup) COMPREPLY=($(compgen -W "--keep --alternative --dry-run --timeout $common" -- "$cur")) ;;
             project/restore) COMPREPLY=($(compgen -W "--alternative --dry-run --timeout $common" -- "$cur")) ;;
             project/settle) COMPREPLY=($(compgen -W "--undo --forget --with --alternative --dry-run --timeout $common" -- "$cur")) ;;
-            project/rename-alternative) COMPREPLY=($(compgen -W "--timeout $edit $common" -- "$cur")) ;;
+            project/rename-alternative) COMPREPLY=($(compgen -W "$edit $common" -- "$cur")) ;;
             *) COMPREPLY=($(compgen -W "$common" -- "$cur")) ;;
         esac
     elif [[ $verb == chunks && $object == @(get|add|remove) ]] && ((cword == 4)) && [[ $prev != -* ]]; then

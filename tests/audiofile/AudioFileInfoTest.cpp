@@ -157,7 +157,7 @@ TEST(AudioFileInfo, BoundsAIFFSoundDataByTheFile)
     }
     EXPECT_EQ(describe(withSound(aiff(4), 16, 4)).dataOffset, 58);
     std::int32_t status = -1;
-    for (const std::int16_t channels : {0, -1}) {
+    for (const auto channels : {std::int16_t{0}, std::int16_t{-1}}) {
         Bytes content = withSound(aiff(4), 16);
         storeBE(content.data() + 20, channels);
         const AudioFileInfo info = describe(content);

@@ -268,7 +268,7 @@ TEST(ContainerPackets, ofMP4HaveSizesInFewerBits)
     const Bytes original = readFile(encoded("ffmpeg -y -i IN -c:a aac OUT", "m4a", kSound));
     const auto count = loadBE<std::uint32_t>(original.data() + bodyOf(original, "stsz") + 8);
     ASSERT_EQ(count % 2, 1U); // so that the last byte of 4-bit sizes holds one
-    for (const std::uint8_t bits : {4, 8, 16}) {
+    for (const auto bits : {std::uint8_t{4}, std::uint8_t{8}, std::uint8_t{16}}) {
         SCOPED_TRACE(int{bits});
         const auto sizeOf = [&](std::uint32_t i) { return bits == 16 ? 250 + i : i * 7 % ((1U << bits) - 1) + 1; };
         Bytes wide = original, compact = original;
@@ -290,7 +290,7 @@ TEST(ContainerPackets, ofMP4HaveSizesInFewerBits)
         put(compact, "stz2", 8, count * 32U / bits + 1); // a packet more than the box has room for
         EXPECT_EQ(refusal(folder.write("compact", compact)), kStatusIOError);
         put(compact, "stz2", 8, count);
-        for (const std::uint8_t other : {0, 7, 32}) {
+        for (const auto other : {std::uint8_t{0}, std::uint8_t{7}, std::uint8_t{32}}) {
             put(compact, "stz2", 7, other);
             EXPECT_EQ(refusal(folder.write("compact", compact)), kStatusIOError) << int{other};
         }

@@ -214,8 +214,9 @@ TEST(XMLParser, AColumnIsTrueOrUnknown)
                 const bool isUnknown = i == 0 && breaks != 0 && ahead > 100 && places.found[i].column == 0;
                 wasUnknown = wasUnknown || isUnknown;
                 EXPECT_EQ(places.found[i].line, expected[i].line);
-                if (!isUnknown)
+                if (!isUnknown) {
                     EXPECT_EQ(places.found[i].column, expected[i].column) << ahead << tag << i;
+                }
             }
         }
     EXPECT_TRUE(wasUnknown);

@@ -194,6 +194,7 @@ TEST(ContainerPackets, ofMP4AreTakenOnlyWhenTheyAreCountedExactly)
         {"replicated bands, said ahead", [](Bytes& file) { put(file, "esds", 35, std::uint8_t{0x2A}); }, kOther},
         {"no descriptor", [](Bytes& file) { rename(file, "esds", "free"); }, kStatusIOError},
         {"another coding", [](Bytes& file) { rename(file, "mp4a", "ac-3"); }, kOther},
+        {"a coding that nobody decodes", [](Bytes& file) { rename(file, "mp4a", "drms"); }, 0, 21024, 0},
     };
     const TemporaryFolder folder;
     const Bytes original = readFile(encoded("ffmpeg -y -i IN -c:a aac OUT", "m4a", kSound));
@@ -324,6 +325,12 @@ TEST(ContainerPackets, ofCAF)
         cookie.insert(cookie.begin() + 8, fields.begin(), fields.end());
         return cookie;
     };
+    // Tag 3: id, flags; tag 4: coding, stream type and rates; tag 5: the configuration.
+    constexpr std::string_view kShortDescriptor = "0316 000100 0411 40 15000000 00000000 00000000 0502 1210";
+    const auto alac = [](CAF& caf, const std::string& bits, const std::string& channels) {
+        caf.id = "alac";
+        caf.cookie = fromHex("00000400 00" + bits + "280a0e" + channels + "00ff 00000000 00000000 0000ac44");
+    };
     const struct {
         const char* name;
         std::function<void(CAF&)> change;
@@ -338,6 +345,19 @@ TEST(ContainerPackets, ofCAF)
         {"a descriptor that depends on another", [&](CAF& caf) { caf.cookie = fullDescriptor(0x80, 2); }, 0, 21, 20000},
         {"a descriptor with an address", [&](CAF& caf) { caf.cookie = fullDescriptor(0x40, 4); }, 0, 21, 20000},
         {"a descriptor with a clock", [&](CAF& caf) { caf.cookie = fullDescriptor(0x20, 2); }, 0, 21, 20000},
+        {"a descriptor of sizes in a byte each", [&](CAF& caf) { caf.cookie = fromHex(kShortDescriptor); }, 0, 21,
+         20000},
+        {"a rate in full", [](CAF& caf) { caf.cookie = fromHex("1780 5622 10"); }, 0, 21, 20000},
+        {"channels by the packets", [](CAF& caf) { caf.cookie = fromHex("1200"); }, kOther},
+        {"channels of a reserved number", [](CAF& caf) { caf.cookie = fromHex("1240"); }, kOther},
+        {"a core coder", [](CAF& caf) { caf.cookie = fromHex("1212"); }, kOther},
+        {"an extension", [](CAF& caf) { caf.cookie = fromHex("1211"); }, kOther},
+        {"a configuration cut short", [](CAF& caf) { caf.cookie = fromHex("12"); }, kOther},
+        {"ALAC", [&](CAF& caf) { alac(caf, "10", "02"); }, 0, 21, 20000},
+        {"ALAC of 20 bits, 8 channels", [&](CAF& caf) { alac(caf, "14", "08"); }, 0, 21, 20000},
+        {"ALAC of 17 bits", [&](CAF& caf) { alac(caf, "11", "02"); }, kStatusIOError},
+        {"ALAC of no channels", [&](CAF& caf) { alac(caf, "18", "00"); }, kStatusIOError},
+        {"ALAC of 9 channels", [&](CAF& caf) { alac(caf, "20", "09"); }, kStatusIOError},
         {"data cut short", [&](CAF& caf) { caf.data.resize(packets.size() - 1); }, 0, 20, 20 * 1024 - 1024},
         {"no table", [](CAF& caf) { caf.table.clear(); }, kStatusIOError},
         {"no cookie", [](CAF& caf) { caf.cookie.clear(); }, kStatusIOError},

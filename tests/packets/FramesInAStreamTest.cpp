@@ -69,6 +69,19 @@ Bytes leadingTag(std::uint32_t size)
     return tag;
 }
 
+/// An APE tag of `size` bytes behind its header, if it has one, with these flags in the footer.
+Bytes trailingTag(std::uint32_t size, std::uint32_t flags, std::string_view id = "APETAGEX")
+{
+    Bytes tag(size + (flags >> 31) * 32, std::byte{0xFF});
+    std::byte* const footer = tag.data() + tag.size() - 32;
+    std::ranges::copy(bytesOf(id), footer);
+    storeLE(footer + 8, std::uint32_t{2000});
+    storeLE(footer + 12, size);
+    storeLE(footer + 16, std::uint32_t{1});
+    storeLE(footer + 20, flags);
+    return tag;
+}
+
 /// A frame that tells of the others: "Xing", frames and bytes, then LAME's own fields with the two numbers of padding.
 Bytes infoFrame(std::uint32_t frameCount, std::uint32_t byteCount, std::uint32_t padding = 576 << 12 | 1000)
 {
@@ -106,6 +119,7 @@ TEST(FramesInAStream, areFoundWhateverStandsAroundThem)
     const Bytes otherRate = frame(77, 0xFFFB9464, 384);  // 48 kHz
     const Bytes oneChannel = frame(78, 0xFFFB90C4, 417); // mono
     const Bytes otherLayer = frame(79, 0xFFFD9064, 417); // II
+    const auto lastOf = [](const Bytes& tag) { return Bytes(tag.end() - 32, tag.end()); };
     const std::string four = "0 1 2 3";
     const std::string ten = "0 1 2 3 4 5 6 7 8 9";
     const struct {
@@ -116,6 +130,8 @@ TEST(FramesInAStream, areFoundWhateverStandsAroundThem)
         {"nothing", few, four},
         {"two tags and zeros", leadingTag(100) + leadingTag(70000) + Bytes(5000) + few, four},
         {"an ID3v1 tag", few + text("TAG") + Bytes(125, std::byte{0xFF}), four},
+        {"what is no APE tag", few + lastOf(trailingTag(700, 0, "APETAGEY")), four},
+        {"an APE tag longer than the file", few + lastOf(trailingTag(7000, 0)), four},
         {"a frame cut off", few + Bytes(run.begin(), run.begin() + 300), four},
         {"junk ahead", junk + run, ten},
         {"junk within", frames(0, 3) + junk + frames(3, 7), ten},
@@ -125,6 +141,8 @@ TEST(FramesInAStream, areFoundWhateverStandsAroundThem)
         {"more junk than is passed over", frames(0, 3) + Bytes(1100000) + frames(3, 7), "0 1 2"},
         {"too much junk ahead", Bytes(66000, std::byte{0xFF}) + run, ""},
         {"one frame", frame(0), "0"},
+        {"two frames and something else", frame(0) + frame(1) + Bytes(600), "0 1"},
+        {"one frame and something else", frame(0) + Bytes(600), ""},
         {"nothing at all", {}, ""},
         {"ADTS", leadingTag(300) + adtsFrame(0) + adtsFrame(1, 5000) + adtsFrame(2), "0 1 2"},
         {"ADTS with junk", adtsFrame(0) + adtsFrame(1, 5000) + junk + adtsFrame(2) + adtsFrame(3), "0 1 2 3"},
@@ -155,6 +173,12 @@ TEST(FramesInAStream, theHeadersCountIsTakenWhenItAgreesWithTheFile)
         std::int32_t priming, remainder;
     } cases[] = {
         {"agrees", infoFrame(10, bytes) + ten, 10, 11520 - 1105 - 471, 1105, 471},
+        {"agrees, ahead of a tag", infoFrame(9, bytes) + ten + trailingTag(100, 0), 9, 10368 - 1105 - 471, 1105, 471},
+        {"of a tag with a header", infoFrame(9, bytes) + ten + trailingTag(100, 1U << 31), 9, 10368 - 1105 - 471, 1105,
+         471},
+        {"of two tags", infoFrame(9, bytes) + ten + trailingTag(100, 1U << 30) + trailingTag(32, 0), 9,
+         10368 - 1105 - 471, 1105, 471},
+        {"fewer frames than the bytes are", infoFrame(2, bytes) + ten, 10, 11520 - 1105, 1105, 0},
         {"other bytes", infoFrame(9, bytes - 1) + ten, 10, 11520 - 1105, 1105, 0},
         {"frames that would not fit", infoFrame(0xFFFFFFFF, bytes) + ten, 10, 11520 - 1105, 1105, 0},
         {"cut short", infoFrame(10, bytes) + frames(0, 8), 8, 9216 - 1105, 1105, 0},

@@ -61,7 +61,7 @@ bool writeItem(AudioFile& file, FourCC id, const std::optional<Bytes>& before, c
         return after ? VireoLoopUUIDUserDataUtils::write(file, uuid, *after)
                      : VireoLoopUUIDUserDataUtils::removeAll(file, uuid);
     }
-    return after ? VireoLoopUserDataUtils::writeFirst(file, id, *after) : VireoLoopUserDataUtils::removeAll(file, id);
+    return after ? VireoLoopUserDataUtils::write(file, id, 0, *after) : VireoLoopUserDataUtils::removeAll(file, id);
 }
 
 std::optional<Bytes> under(const std::map<FourCC, Bytes>& texts, FourCC id)

@@ -25,8 +25,8 @@ bool CombinedTaggingAifChunkWriter::writeChunk()
         return false;
     const Bytes basic = Types::basicTaggingDataFromCombinedAidChunkData(*archive);
     const Bytes categories = Types::categoryDataFromCombinedAidChunkData(*archive);
-    return (basic.empty() || UserData::writeFirst(file_, tagging::kBasicTagging, basic)) &&
-           (categories.empty() || UserData::writeFirst(file_, tagging::kCategories, categories));
+    return (basic.empty() || UserData::write(file_, tagging::kBasicTagging, 0, basic)) &&
+           (categories.empty() || UserData::write(file_, tagging::kCategories, 0, categories));
 }
 
 bool CombinedTaggingAifChunkRemover::removeChunk()

@@ -87,7 +87,7 @@ bool FileInfoAifChunkWriter::writeChunk()
         return false;
     for (const char* key : kKeys) {
         const auto part = Types::aifChunkDataPartFromAifChunkData(*archive, key);
-        if (part && !UserData::writeFirst(file_, Types::fileInfoTypeForKey(key), *part))
+        if (part && !UserData::write(file_, Types::fileInfoTypeForKey(key), 0, *part))
             return false;
     }
     return true;

@@ -32,7 +32,7 @@ bool GenericCafChunkWriter::writeChunk()
     if (!data || hasNoPlaceInCAF(chunk_))
         return false;
     return chunk_.cafChunkIsUUIDChunk() ? UUIDUserData::write(file_, *chunk_.cafChunkUUID(), *data)
-                                        : UserData::writeFirst(file_, chunk_.cafChunkID(), *data);
+                                        : UserData::write(file_, chunk_.cafChunkID(), 0, *data);
 }
 
 bool GenericCafChunkRemover::removeChunk()
@@ -56,7 +56,7 @@ bool GenericAifChunkWriter::writeChunk()
     if (chunk_.aifChunkID() == 0)
         return true; // a chunk of CAF files only
     const auto data = chunk_.chunkData().chunkDataForAudioFileType(fourCC("AIFF"));
-    return data && UserData::writeFirst(file_, chunk_.aifChunkID(), *data);
+    return data && UserData::write(file_, chunk_.aifChunkID(), 0, *data);
 }
 
 bool GenericAifChunkRemover::removeChunk()

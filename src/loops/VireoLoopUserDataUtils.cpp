@@ -7,19 +7,6 @@
 
 using platform::AudioFile;
 
-namespace {
-
-/// Removes the items from an index on, the last one first.
-bool removeFrom(AudioFile& file, FourCC type, std::uint32_t index)
-{
-    for (std::uint32_t left = VireoLoopUserDataUtils::count(file, type); left > index; --left)
-        if (file.removeUserData(type, left - 1) != kStatusOK)
-            return false;
-    return true;
-}
-
-} // namespace
-
 std::uint32_t VireoLoopUserDataUtils::count(AudioFile& file, FourCC type)
 {
     std::uint32_t count = 0;
@@ -46,17 +33,12 @@ bool VireoLoopUserDataUtils::write(AudioFile& file, FourCC type, std::uint32_t i
            file.setUserData(type, index, static_cast<std::uint32_t>(data.size()), data.data()) == kStatusOK;
 }
 
-bool VireoLoopUserDataUtils::writeFirst(AudioFile& file, FourCC type, BytesView data)
-{
-    std::uint32_t size = 0;
-    if (file.userDataSize(type, 0, size) == kStatusOK && size != data.size() && !removeFrom(file, type, 1))
-        return false;
-    return write(file, type, 0, data);
-}
-
 bool VireoLoopUserDataUtils::removeAll(AudioFile& file, FourCC type)
 {
-    return removeFrom(file, type, 0);
+    for (std::uint32_t left = count(file, type); left > 0; --left)
+        if (file.removeUserData(type, left - 1) != kStatusOK)
+            return false;
+    return true;
 }
 
 namespace {
@@ -66,16 +48,6 @@ bool hasUUID(AudioFile& file, std::uint32_t index, const tagging::UUIDBytes& uui
     const auto start = VireoLoopUserDataUtils::read(file, tagging::kCAFUUIDChunk, index, tagging::kUUIDSize);
     return start && start->size() == tagging::kUUIDSize &&
            UUIDIsEqual(reinterpret_cast<const std::uint8_t*>(start->data()), uuid);
-}
-
-/// Removes the items of the UUID from an index on, the last one first, so that a removal moves none that is still to be
-/// looked at.
-bool removeBehind(AudioFile& file, const tagging::UUIDBytes& uuid, std::uint32_t index)
-{
-    for (std::uint32_t left = VireoLoopUserDataUtils::count(file, tagging::kCAFUUIDChunk); left > index; --left)
-        if (hasUUID(file, left - 1, uuid) && file.removeUserData(tagging::kCAFUUIDChunk, left - 1) != kStatusOK)
-            return false;
-    return true;
 }
 
 } // namespace
@@ -105,15 +77,15 @@ bool VireoLoopUUIDUserDataUtils::write(AudioFile& file, const tagging::UUIDBytes
     Bytes item(prefix.begin(), prefix.end());
     item.insert(item.end(), data.begin(), data.end());
     const auto first = find(file, uuid);
-    std::uint32_t size = 0;
-    if (first && file.userDataSize(tagging::kCAFUUIDChunk, *first, size) == kStatusOK && size != item.size() &&
-        !removeBehind(file, uuid, *first + 1))
-        return false;
     const std::uint32_t index = first ? *first : VireoLoopUserDataUtils::count(file, tagging::kCAFUUIDChunk);
     return VireoLoopUserDataUtils::write(file, tagging::kCAFUUIDChunk, index, item);
 }
 
 bool VireoLoopUUIDUserDataUtils::removeAll(AudioFile& file, const tagging::UUIDBytes& uuid)
 {
-    return removeBehind(file, uuid, 0);
+    // The last one first, so that a removal moves none that is still to be looked at.
+    for (std::uint32_t left = VireoLoopUserDataUtils::count(file, tagging::kCAFUUIDChunk); left > 0; --left)
+        if (hasUUID(file, left - 1, uuid) && file.removeUserData(tagging::kCAFUUIDChunk, left - 1) != kStatusOK)
+            return false;
+    return true;
 }

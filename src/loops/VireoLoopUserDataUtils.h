@@ -14,11 +14,9 @@ public:
     /// The item's bytes, at most `limit` of them.
     static std::optional<Bytes> read(platform::AudioFile& file, FourCC type, std::uint32_t index,
                                      std::uint32_t limit = UINT32_MAX);
-    /// Replaces the item, or adds one when `index` is the count.
+    /// Replaces the item, or adds one when `index` is the count. Further items stay, and keep their indices. Readers of
+    /// loop chunks take the first one.
     static bool write(platform::AudioFile& file, FourCC type, std::uint32_t index, BytesView data);
-    /// Replaces the first item, the one that readers take, or adds one. Further items, which an item that must move
-    /// could come to stand behind, are removed ahead of that.
-    static bool writeFirst(platform::AudioFile& file, FourCC type, BytesView data);
     /// Leaves no item of the type behind; false when one could not be removed.
     static bool removeAll(platform::AudioFile& file, FourCC type);
 };
@@ -29,8 +27,7 @@ public:
     /// The index of the first item of the UUID.
     static std::optional<std::uint32_t> find(platform::AudioFile& file, const tagging::UUIDBytes& uuid);
     static std::optional<Bytes> read(platform::AudioFile& file, const tagging::UUIDBytes& uuid);
-    /// Replaces the first item of the UUID, which is the one that readers take; adds one when there is none. Further
-    /// items of the UUID may go, as above.
+    /// Replaces the first item of the UUID, which is the one that readers take; adds one when there is none.
     static bool write(platform::AudioFile& file, const tagging::UUIDBytes& uuid, BytesView data);
     static bool removeAll(platform::AudioFile& file, const tagging::UUIDBytes& uuid);
 };

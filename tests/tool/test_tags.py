@@ -323,6 +323,16 @@ class WhatIsNotNamedStays(TagsTest):
         self.may_change = {b"NAME"}
         self.edited("a.aiff", "title=T")
 
+    def test_further_chunks_of_a_kind(self):
+        for value in ("Me", "longer than what was there"):
+            self.fresh_aiff((b"AUTH", b"One"), (b"AUTH", b"Two"), (b"CHST", b"strip"), (b"AUTH", b"Three"))
+            self.set("a.aiff", "artist=" + value)
+            listed = self.json("chunks", "a.aiff")["chunks"]
+            content = (self.folder / "a.aiff").read_bytes()
+            bodies = [content[chunk["offset"] + 8:][:chunk["size"]].decode() for chunk in listed
+                      if chunk["id"] == "AUTH"]
+            self.assertEqual(bodies, [value, "Two", "Three"])
+
     def test_pairs_of_a_caf_file(self):
         basic = [(b"genre", b"R,B"), (b"beat count", b"5000000000"), (b"tempo", b"120,5"), (b"\xFCber", b"caf\xE9"),
                  (b"key signature", b"Cb"), (b"time signature", b"4/0"), (b"category", b"Dr\xFCms"), (b"zz", b""),

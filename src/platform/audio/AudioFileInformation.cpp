@@ -77,18 +77,14 @@ std::int32_t AudioFile::setInformation(const Dictionary& information)
     }
     if (writer.size() > std::numeric_limits<std::uint32_t>::max())
         return kStatusFileTooBig;
-    // A further "info", which nobody reads, would become the first when that one must move, or goes.
-    std::uint32_t count = 0, size = 0;
-    if (const std::int32_t status = countUserData(kInfo, count); status != kStatusOK)
-        return status;
-    const bool isInPlace =
-        !information.empty() && count > 0 && userDataSize(kInfo, 0, size) == kStatusOK && size == writer.size();
-    for (; count > 1 && !isInPlace; --count)
-        if (const std::int32_t status = implementation_->removeItem(kInfo, count - 1); status != kStatusOK)
-            return status;
     if (!information.empty())
         return implementation_->setItem(kInfo, 0, writer.view());
-    return count == 0 ? kStatusOK : implementation_->removeItem(kInfo, 0);
+    // A further "info", which nobody reads, would become the first: the last one goes first.
+    std::uint32_t count = 0;
+    std::int32_t status = countUserData(kInfo, count);
+    for (; status == kStatusOK && count > 0; --count)
+        status = implementation_->removeItem(kInfo, count - 1);
+    return status;
 }
 
 } // namespace platform

@@ -286,6 +286,24 @@ TEST_F(FaultTest, WithoutTicketsAccessStillExcludesAndEnds)
     EXPECT_TRUE(reader.expect("r out"));
 }
 
+// Whoever is present and has nothing to be asked through has just ended, or begun: its slot is for others then.
+TEST_F(FaultTest, ThePresenceOfOneWhoCannotBeAskedIsWaitedForAndLeftAlone)
+{
+    const ItemWindow window(CoordinatedItem(itemURL()).key());
+    Descriptor gone = CoordinationDirectory::current()->takeStripe(window.stripe);
+    for (const bool isWriting : {false, true}) {
+        const ByteRange byte = {window.presence(isWriting).start + 3, 1};
+        ASSERT_TRUE(tryLock(gone.get(), byte, LockKind::exclusive));
+        AgentProcess comer(folder());
+        comer.begin("c", isWriting ? "write" : "read", item());
+        ASSERT_TRUE(awaitWaiting(comer, item(), isWriting));
+        unlock(gone.get(), byte);
+        ASSERT_TRUE(comer.gets("c"));
+        EXPECT_TRUE(tryLock(gone.get(), byte, LockKind::exclusive)) << (isWriting ? "write" : "read");
+        unlock(gone.get(), window.whole());
+    }
+}
+
 TEST_F(FaultTest, AFileMayBeCreatedReplacedAndRenamedWhileItIsLocked)
 {
     const auto write = [](const std::string& path) { std::ofstream(path) << "content"; };

@@ -119,7 +119,8 @@ void ChunkInventory::walk(const EditScope& scope)
         throw Failure("its chunks cannot be read");
     fileLength_ = extent.fileLength;
     // Less than a chunk header is no more than a pad byte that went astray.
-    if (!isUnfinished_ && fileLength_ - end_ >= std::int64_t{sizeof(ChkHeader)})
+    const auto headerSize = static_cast<std::int64_t>(extent.id == kCaff ? sizeof(CAFChunkHeader) : sizeof(ChkHeader));
+    if (!isUnfinished_ && fileLength_ - end_ >= headerSize)
         entries_.push_back({0, end_, fileLength_ - end_});
 }
 

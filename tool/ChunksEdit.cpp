@@ -113,7 +113,7 @@ EditReport addToContainer(const EditArguments& arguments, const Bytes& body)
         CAudioFileIO file;
         openContainer(file, edit.target(), 0);
         const ChunkSurvey found = surveyChunks(file, arguments.id);
-        objection = objectionToAdding(file, found, arguments.id, report.size);
+        objection = objectionToAdding(file, found, arguments.id);
         report.replaced = arguments.replace ? found.count : 0;
     }
     const EditScope scope = scopeOf(arguments, objection);

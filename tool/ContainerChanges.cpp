@@ -42,6 +42,14 @@ std::string addStatusText(std::int32_t status)
     throw Failure(addStatusText(status) + (writing && systemError != 0 ? ": " + systemErrorText(systemError) : ""));
 }
 
+// Puts right at the end of the container what can be; what cannot be, --force overrules.
+void prepareToAppend(CAudioFileIO& file, bool isForced)
+{
+    const std::int32_t status = file.PrepareToAppend();
+    if (status != kStatusParameterError || !isForced)
+        requireOK(status);
+}
+
 } // namespace
 
 ChunkSurvey surveyOf(const std::string& path, FourCC id)
@@ -71,12 +79,16 @@ void removeChunksFrom(const std::string& path, FourCC id, std::int64_t count)
 
 void addChunkTo(const std::string& path, const NewChunk& chunk)
 {
-    if (chunk.replaces) // not left to AddChunk, which removes only the first of them from a CAF file
-        removeChunksFrom(path, chunk.id, surveyOf(path, chunk.id).count);
     CAudioFileIO file;
     openContainer(file, path, kFileIOReadWrite);
+    prepareToAppend(file, chunk.isForced);
+    if (chunk.replaces) { // not left to AddChunk, which removes only the first of them from a CAF file
+        requireOK(file.Close());
+        removeChunksFrom(path, chunk.id, surveyOf(path, chunk.id).count);
+        openContainer(file, path, kFileIOReadWrite);
+        prepareToAppend(file, chunk.isForced);
+    }
     const std::int64_t before = surveyChunks(file, chunk.id).count;
-    settleOpenEndedData(file);
     const std::int64_t length = file.GetEOF();
     errno = 0;
     const std::int32_t status = file.AddChunk(chunk.id, chunk.body, false);

@@ -22,12 +22,8 @@ struct ChunkSurvey {
 /// Throws Failure when the container cannot be walked.
 ChunkSurvey surveyChunks(CAudioFileIO& file, FourCC id);
 
-/// Why a chunk of `size` bytes should not be added, and what would be lost; none when nothing speaks against it.
-std::optional<std::string> objectionToAdding(CAudioFileIO& file, const ChunkSurvey& survey, FourCC id,
-                                             std::int64_t size);
+/// Why a chunk should not be added, and what would be lost; none when nothing speaks against it. Throws Failure when
+/// the container cannot be walked.
+std::optional<std::string> objectionToAdding(CAudioFileIO& file, const ChunkSurvey& survey, FourCC id);
 /// The same for removing every chunk of the id.
 std::optional<std::string> objectionToRemoving(const ChunkSurvey& survey, FourCC id);
-
-/// Writes the real size into a last CAF chunk "data" of size -1 ("to the end of the file"), so that what is put behind
-/// it does not become sound. Throws Failure.
-void settleOpenEndedData(CAudioFileIO& file);

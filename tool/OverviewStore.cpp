@@ -37,7 +37,7 @@ bool isKept(const FileOverview& overview)
            });
 }
 
-void refuseObjections(const std::string& path, const FileOverview& overview, std::size_t size)
+void refuseObjections(const std::string& path, const FileOverview& overview)
 {
     CAudioFileIO file;
     openContainer(file, path, 0);
@@ -45,7 +45,7 @@ void refuseObjections(const std::string& path, const FileOverview& overview, std
         throw Failure(fmt::format("says that it has {} frames and holds {}: its overview would not be found again",
                                   file.Info().frames, overview.info().frames));
     const FourCC id = overview.info().fileType == kCaff ? kCAFOverviewId : kOverviewId;
-    if (const auto objection = objectionToAdding(file, surveyChunks(file, id), id, static_cast<std::int64_t>(size)))
+    if (const auto objection = objectionToAdding(file, surveyChunks(file, id), id))
         throw Failure(*objection);
 }
 
@@ -54,7 +54,7 @@ void write(const std::string& path, FileOverview& overview, bool kept)
     {
         CAudioFileIO file;
         openContainer(file, path, kFileIOReadWrite);
-        settleOpenEndedData(file);
+        requireOK(file.PrepareToAppend()); // an open-ended chunk "data" has its size then
         requireOK(file.Close());
     }
     errno = 0;
@@ -84,8 +84,7 @@ StoreResult storeOverview(SafeEdit& edit, FileOverview& overview, const EditOpti
     result.changed = result.stored ? !before || !areEqual(*before, overview.block()) : before != nullptr;
     if (!result.changed)
         return result;
-    const std::size_t size = overview.block().size() * (overview.info().fileType == kCaff ? 2 : 1);
-    refuseObjections(edit.target(), overview, size);
+    refuseObjections(edit.target(), overview);
     if (!options.dryRun)
         result.backup = edit.apply(kScope, [&](const std::string& path) { write(path, overview, result.stored); });
     return result;

@@ -206,7 +206,7 @@ void Sidecars::addToMetadata(FourCC id, const Bytes& body, bool force)
     if (isWhole) {
         CAudioFileIO file;
         openContainer(file, edit.target(), 0);
-        objection = objectionToAdding(file, surveyChunks(file, id), id, std::ssize(body));
+        objection = objectionToAdding(file, surveyChunks(file, id), id);
     } else if (!torn) {
         objection = "is no metadata sidecar, and would be lost";
     }

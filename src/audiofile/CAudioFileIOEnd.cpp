@@ -1,12 +1,71 @@
 // CAudioFileIO: the end of a container, looked at before another chunk goes there.
-#include "audiofile/CAudioFileIO.h"
+#include "audiofile/ContainerTail.h"
+
+#include <limits>
 
 namespace {
 
 constexpr std::int64_t kCAFOpenEnd = -1;
 constexpr FourCC kSoundData = fourCC("SSND");
 
+std::int64_t headerSizeIn(bool isCAF)
+{
+    return static_cast<std::int64_t>(isCAF ? sizeof(CAFChunkHeader) : sizeof(ChkHeader));
+}
+
+bool looksLikeAnId(FourCC id)
+{
+    return id != 0 && fourCCText(id).size() == sizeof id;
+}
+
+/// Behind a size that was never filled in, the samples stand.
+bool isOpenData(const ChunkEntry& chunk, bool isCAF)
+{
+    constexpr std::int64_t editCountSize = 4, soundDataHeaderSize = 8;
+    return (chunk.id == kData && chunk.size <= (isCAF ? editCountSize : 0)) ||
+           (chunk.id == kSoundData && chunk.size <= soundDataHeaderSize);
+}
+
+ContainerTail::Fault faultOf(const ContainerTail& tail)
+{
+    using Fault = ContainerTail::Fault;
+    const ChunkEntry& last = tail.last;
+    if (last.offset == 0)
+        return Fault::noChunk;
+    const bool isCAF = tail.extent.id == kCaff;
+    if (last.size < 0)
+        return Fault::cutShort;
+    const std::int64_t headerSize = headerSizeIn(isCAF);
+    const bool isCutShort = last.size > tail.extent.fileLength - last.offset - headerSize;
+    if ((isCutShort || tail.stray > 0) && !isCAF && !looksLikeAnId(last.id))
+        return Fault::noId;
+    if (isCutShort) // AddChunk puts that right, except in CAF
+        return isCAF ? Fault::cutShort : Fault::none;
+    if (tail.stray >= headerSize || (tail.stray > 0 && isOpenData(last, isCAF)))
+        return Fault::stray;
+    return Fault::none;
+}
+
 } // namespace
+
+std::int32_t ExamineContainerTail(CAudioFileIO& file, ContainerTail& tail)
+{
+    tail = {};
+    const auto keep = [&](const ChunkEntry& chunk) {
+        tail.last = chunk;
+        return true;
+    };
+    if (const std::int32_t status = file.ForEachChunk(keep, &tail.extent); status != kStatusOK)
+        return status;
+    const bool isCAF = tail.extent.id == kCaff;
+    const std::int64_t size = tail.last.size;
+    const std::int64_t body = tail.last.offset + headerSizeIn(isCAF);
+    if (tail.last.offset != 0 && __builtin_add_overflow(body + (isCAF ? 0 : size & 1), size, &tail.end))
+        tail.end = std::numeric_limits<std::int64_t>::max();
+    tail.stray = tail.extent.fileLength - tail.end;
+    tail.fault = faultOf(tail);
+    return kStatusOK;
+}
 
 std::int32_t CAudioFileIO::PrepareToAppend()
 {
@@ -14,41 +73,27 @@ std::int32_t CAudioFileIO::PrepareToAppend()
         return kStatusWritePermission;
     if (const std::int32_t status = PrepareToEdit(); status != kStatusOK)
         return status;
-    ContainerExtent extent;
-    ChunkEntry last;
-    const auto keep = [&](const ChunkEntry& chunk) {
-        last = chunk;
-        return true;
-    };
-    if (const std::int32_t status = ForEachChunk(keep, &extent); status != kStatusOK)
+    ContainerTail tail;
+    if (const std::int32_t status = ExamineContainerTail(*this, tail); status != kStatusOK)
         return status;
-    if (last.offset == 0 || last.size < 0)
-        return kStatusParameterError;
-    const bool isCAF = extent.id == kCaff;
-    const auto headerSize = static_cast<std::int64_t>(isCAF ? sizeof(CAFChunkHeader) : sizeof(ChkHeader));
-    if (isCAF && last.id == kData)
-        if (const std::int32_t status = SettleOpenEnd(last); status != kStatusOK)
-            return status;
-    const std::int64_t body = last.offset + headerSize;
-    if (last.size > extent.fileLength - body) // AddChunk puts that right, except in CAF
-        return isCAF ? std::int32_t{kStatusParameterError} : std::int32_t{kStatusOK};
-    const bool isPadded = !isCAF && (last.size & 1) != 0;
-    const std::int64_t end = body + last.size + (isPadded ? 1 : 0);
-    const std::int64_t stray = extent.fileLength - end;
-    // Behind a size that was never filled in, the samples stand.
-    const bool isOpenData =
-        (last.id == kData && last.size <= (isCAF ? 4 : 0)) || (last.id == kSoundData && last.size <= 8);
-    if (stray >= headerSize || (stray > 0 && isOpenData))
+    if (tail.fault != ContainerTail::Fault::none)
         return kStatusParameterError;
     std::int32_t status = kStatusOK;
-    if (stray < 0) {
+    if (tail.extent.id == kCaff && tail.last.id == kData)
+        status = SettleOpenEnd(tail.last);
+    if (status != kStatusOK)
+        return status;
+    const bool lacksPad = tail.stray == -1 && (tail.last.size & 1) != 0;
+    if (tail.stray < 0 && !lacksPad) // a last chunk cut short: AddChunk gives it the size that it has
+        return kStatusOK;
+    if (lacksPad) {
         const char pad = 0;
-        status = Write(&pad, end - 1, sizeof pad);
-    } else if (stray > 0) {
-        status = SetEOF(end);
+        status = Write(&pad, tail.end - 1, sizeof pad);
+    } else if (tail.stray > 0) {
+        status = SetEOF(tail.end);
     }
     if (status == kStatusOK)
-        mInfo.fileLength = end;
+        mInfo.fileLength = tail.end;
     return status;
 }
 

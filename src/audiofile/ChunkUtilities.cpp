@@ -129,8 +129,10 @@ std::int32_t CFileUtilAddData(const CFileRef& file, const CChunkData& chunk, con
     transform(copy.get(), size, kWriting);
     if (target.IsOpen() && target.InfoStatus() == kStatusIOError) // what it is, nobody knows
         return kStatusIOError;
-    if (takesChunks(target))
+    if (takesChunks(target)) {
+        target.PrepareToAppend(); // Kept: where that refuses, AddChunk does what it can
         return statusOfAdding(target.AddChunk(chunk.id, copy.get(), size, true), kStatusOK);
+    }
     target.Close();
 
     const std::int32_t raw = hadRawSidecar ? writeRawSidecar(rawSidecar, copy.get(), size) : kStatusOK;

@@ -84,6 +84,16 @@ TEST(ChunkUtilities, OtherFilesHaveAMetadataSidecarThatIsReadWhole)
     EXPECT_EQ(textOf(readFile(folder / "song.ktmd")), whole);
 }
 
+TEST(ChunkUtilities, AnOpenEndedCAFDoesNotSwallowWhatIsAdded)
+{
+    const TemporaryFolder folder;
+    const std::string path =
+        folder.write("a.caf", ContainerBuilder("caff").format().chunk("data", "1234abcd", -1).bytes());
+    EXPECT_EQ(add(path, "abc"), kStatusOK);
+    EXPECT_EQ(bodyIn(path), "bcd");
+    EXPECT_EQ(bodyIn(path, kData), "1234abcd");
+}
+
 TEST(ChunkUtilities, ATaggedLoopIsSparedOnRequest)
 {
     const TemporaryFolder folder;

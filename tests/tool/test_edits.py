@@ -60,16 +60,16 @@ class Edits(CommandTest):
         stray = wave() + b"stray sound that nobody counted"
         cases = [  # name, content, verb, id, what is said
             ("uncounted", wave(chunk(b"LIST", bytes(90)), size=236), "add", "note", "its container ends at byte 244, but 98 "
-             "bytes follow its chunks (an unfinished recording?), and the new chunk would be written over 12 of them"),
-            ("unfinished", wave(size=0), "add", "note", "its container ends at byte 8, but 208 bytes follow its chunks"),
+             "bytes follow its chunks (an unfinished recording?), and the new chunk would be written over them"),
+            ("unfinished", wave(size=0), "add", "note", "its container ends at byte 8"),
             ("behind", stray, "add", "note", "31 bytes follow its chunks"),
-            ("few", wave() + b"few", "add", "note", '3 stray bytes at its end would become part of the chunk "data"'),
+            ("no size", wave()[:40] + bytes(4) + b"few", "add", "note", "3 bytes follow its chunks"),
             ("zero data", wave()[:40] + bytes(4) + b"\1\2\3\4\5\0\0\0" * 25, "add", "note", "is no chunk"),
             ("second", wave(), "add", "fmt", 'it has a chunk "fmt "'),
             ("sound", wave(), "remove", "data", "would be lost"),
             ("caf sound", caf(), "remove", "desc", "would be lost"),
             ("caf cut", caf(data_size=999), "add", "note", "claims more bytes than the file has"),
-            ("caf stray", caf(data_size=200), "add", "note", "4 stray bytes follow"),
+            ("caf stray", caf() + bytes(12), "add", "note", "12 stray bytes follow"),
         ]
         for name, content, verb, chunk_id, message in cases:
             with self.subTest(name):
@@ -93,6 +93,23 @@ class Edits(CommandTest):
             self.add("a.wav", "note")
             self.assertEqual([item["id"] for item in self.json("chunks", "a.wav")["chunks"]], ["fmt ", "data", "note"])
             self.assertEqual(path.read_bytes()[44:243], wave()[44:243])
+
+    def test_stray_bytes_that_are_no_chunk_are_no_obstacle(self):
+        """Neither are they sound, nor is the new chunk lost behind them, on any of the roads."""
+        for name, clean, stray in (("a.wav", wave(), b"few"), ("b.wav", wave(size=238), b"\0\0"), ("a.caf", caf(), b"\0"),
+                                   ("b.caf", caf(), b"eleven here")):
+            for arguments in (["chunks", "add", name, "note"], ["chunks", "add", name, "note", "--replace"],
+                              ["chunks", "add", name, "note", "--sidecar", "ovw"], ["overview", name, "--store"]):
+                for options in ([], ["--in-place"]):
+                    with self.subTest((arguments, options)):
+                        path = self.write(name, wave() if name == "b.wav" else clean)
+                        self.run_command(*arguments, *options)
+                        expected = path.read_bytes()
+                        path.write_bytes(clean + stray)
+                        self.run_command(*arguments, *options, "--dry-run")
+                        self.assertEqual(path.read_bytes(), clean + stray)
+                        self.run_command(*arguments, *options)
+                        self.assertEqual(path.read_bytes(), expected)
 
     def test_keeps_what_belongs_to_the_file(self):
         path = self.write("a.wav", wave())

@@ -70,6 +70,22 @@ class FailingCalls(CommandTest):
             for call, error in (("pwrite64", "ENOSPC"), ("fsync", "EIO"), ("pread64", "EIO")):
                 self.sweep(call, error, files, "s.ktmd", old, new, "chunks", "add", "s.mp3", name, "--sidecar", "ovw")
 
+    def test_lists_are_whole_or_fail(self):
+        for name, content in (("a.wav", wave(*(chunk(b"keep", bytes(9000)) for _ in range(3)))),
+                              ("a.caf", caf(*((b"keep", bytes(9000)) for _ in range(3))))):
+            self.write(name, content)
+            for arguments in (("chunks", name), ("chunks", "--json", name), ("chunks", "get", name, "data")):
+                whole = self.run_command(*arguments).stdout
+                failed = 0
+                for number in range(1, MOST_CALLS):
+                    result = self.run_failing("pread64", "EIO", number, *arguments)
+                    if result is None:
+                        break
+                    failed += result.returncode != 0
+                    if result.returncode == 0:
+                        self.assertEqual(result.stdout, whole, (arguments, number))
+                self.assertGreater(failed, 2, arguments)
+
     def test_no_folder_is_read(self):
         self.write("a.wav", wave())
         log = self.folder.with_suffix(".log")

@@ -149,9 +149,11 @@ std::string SafeEdit::applyToCopy(const EditScope& scope, const Change& change)
     TemporaryFile copy(target_);
     copyTo(copy);
     change(copy.path());
-    if (scope.kind == EditScope::Kind::chunks)
+    if (scope.kind == EditScope::Kind::chunks) {
+        requireUntouched(copy.targetIs(status_)); // else the copy would be blamed for what another program did
         ChunkInventory(file_.get(), scope, Bodies::whole)
             .requireSameIn(ChunkInventory(copy.descriptor(), scope, Bodies::whole));
+    }
     copyAttributes(file_.get(), status_, copy.descriptor(), options_.keepTimes ? Times::kept : Times::now);
     synchronize(copy.descriptor());
 

@@ -90,8 +90,10 @@ void makeLoopOfBeats(const LoopTags& before, std::vector<TagAssignment>& assignm
     };
     const auto beats = named(VireoLoopCombinedTagsChunkDataBeatCountKey);
     if (beats != assignments.end() && !isAbsent(beats->value) && named(type) == assignments.end() &&
-        before.fileType == kAIFF && isAbsent(valueUnder(before.combined, type)))
-        assignments.push_back({fieldsForKey("loopFileType").front(), 1});
+        before.fileType == kAIFF && isAbsent(valueUnder(before.combined, type))) {
+        assignments.push_back({fieldsForKey("loopFileType").front(), {}});
+        assignments.back().value = 1; // g++ 12 warns, wrongly, of a value that is moved into the list
+    }
 }
 
 // A tag that was asked for and cannot be kept is a mistake on the command line; one that would be lost on the way makes

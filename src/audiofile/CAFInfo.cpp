@@ -4,8 +4,8 @@
 #include "audiofile/ContainerWalk.h"
 
 #include "loops/tagging/ChunkIDs.h"
+#include "platform/CompressedAudio.h"
 #include "platform/core/ByteReader.h"
-#include "platform/packets/PacketSource.h"
 
 #include <optional>
 
@@ -124,17 +124,16 @@ std::int64_t compressedFrames(const platform::StreamDescription& description, co
 // What the packets hold that are there, where the library finds them.
 void setCompressedFrames(const platform::URLRef& url, const Chunks& chunks, AudioFileInfo& info)
 {
-    std::int32_t status = kStatusParameterError;
-    const auto packets = url ? platform::openPacketSource(url->posixPath(), &status) : nullptr;
-    info.framesAreStated = !packets;
-    if (!packets) {
+    platform::CompressedAudio packets;
+    info.framesAreStated = !url || platform::describePackets(*url, packets) != kStatusOK;
+    if (info.framesAreStated) {
         info.frames = compressedFrames(chunks.format->stream, chunks.packetTable, info);
         return;
     }
-    SetSampleRate(info, packets->format().sampleRate);
-    info.channels = static_cast<std::int32_t>(packets->format().channelsPerFrame);
+    SetSampleRate(info, packets.format.sampleRate);
+    info.channels = static_cast<std::int32_t>(packets.format.channelsPerFrame);
     info.busFormat = BusFormatOf(chunks.speakers, info.channels);
-    info.frames = packets->table().validFrames;
+    info.frames = static_cast<std::int64_t>(packets.frames);
 }
 
 } // namespace

@@ -2,8 +2,8 @@
 #include "audiofile/ContainerDescriptions.h"
 
 #include "platform/CompressedAudio.h"
+#include "platform/FLACEnd.h"
 #include "platform/core/ByteReader.h"
-#include "platform/packets/FLACEnd.h"
 
 #include <algorithm>
 #include <limits>

@@ -15,6 +15,11 @@ struct CompressedAudio {
     std::uint64_t frames = 0;
 };
 
+/// Where the library finds the packets itself, in MP3, ADTS, MP4 and CAF files, and knows their frames exactly: the
+/// decoder module is not asked. AudioHandle::kFormatNotSupported elsewhere; kStatusIOError for a file of these that is
+/// broken.
+std::int32_t describePackets(const URL& url, CompressedAudio& audio);
+
 /// `start` are the file's first bytes, 16 where it has so many. MP3, AAC of more than 24 kHz and M4A are described
 /// without the decoder module, which is loaded for none but files that begin as one of its kinds does.
 /// kStatusParameterError for a file that is none of these; AudioHandle::kFormatNotSupported, with `audio.fileType` set,

@@ -216,6 +216,11 @@ struct Encoding {
     const char* command; // of IN, OUT
 };
 
+void PrintTo(const Encoding& encoding, std::ostream* out)
+{
+    *out << encoding.extension;
+}
+
 class AgreementOnFilesOf : public Agreement, public ::testing::WithParamInterface<std::vector<Encoding>> {};
 
 TEST_P(AgreementOnFilesOf, WholeCutAndDamaged)

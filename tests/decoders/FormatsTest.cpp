@@ -91,7 +91,7 @@ const Format formats[] = {
     {"wavpack.wv", "ffmpeg -i source.wav wavpack.wv", fourCC("wvpk"), fourCC("wvpk"), 16},
     {"wma.wma", "ffmpeg -i source.wav -c:a wmav2 -b:a 128k wma.wma", fourCC('m', 's', 1, 0x61), fourCC("asf "), 0,
      Length::encoder},
-    {"mp2.mp2", "ffmpeg -i source.wav -b:a 192k mp2.mp2", fourCC(".mp2"), fourCC("MPG3"), 0, Length::encoder},
+    {"mp2.mp2", "ffmpeg -i source.wav -b:a 192k mp2.mp2", fourCC(".mp2"), fourCC("MPG2"), 0, Length::encoder},
     {"ac3.ac3", "ffmpeg -i source.wav -b:a 640k ac3.ac3", fourCC("ac-3"), fourCC("ac-3"), 0, Length::encoder, kNoisy},
     {"flac.mka", "ffmpeg -i source.wav -c:a flac flac.mka", fourCC("flac"), fourCC("mkv "), 16},
     {"vorbis.mka", "ffmpeg -i source.wav -c:a libvorbis vorbis.mka", fourCC("vorb"), fourCC("mkv "), 0,

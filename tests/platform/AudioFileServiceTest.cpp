@@ -198,7 +198,7 @@ TEST(AudioFileService, HostileFilesCostNothing)
     }
 }
 
-TEST(AudioFileService, CAFWhosePacketsHoldNoFramesHasNoFormat)
+TEST(AudioFileService, CAFWhosePacketsHoldNoFramesIsReadByItsBits)
 {
     TemporaryFolder folder;
     Chunks chunks{formatChunk(fourCC("caff")), dataChunk(fourCC("caff"))};
@@ -206,7 +206,9 @@ TEST(AudioFileService, CAFWhosePacketsHoldNoFramesHasNoFormat)
     const auto file = openAudio(folder.write("file", buildContainer(fourCC("caff"), chunks)));
     ASSERT_NE(file, nullptr);
     StreamDescription format;
-    EXPECT_EQ(file->dataFormat(format), kStatusIOError); // and nothing is divided by 0
+    EXPECT_EQ(file->dataFormat(format), kStatusOK); // and nothing is divided by 0
+    EXPECT_EQ(format.framesPerPacket, 1U);
+    EXPECT_EQ(format.bytesPerFrame, format.channelsPerFrame * format.bitsPerChannel / 8);
 }
 
 // EBU Tech 3306: sizes of chunks beside "data", by their ids.

@@ -1,6 +1,6 @@
 #include "platform/audio/AudioDescription.h"
 
-#include "platform/audio/StoredFormat.h"
+#include "platform/StoredFormat.h"
 #include "platform/core/Packed.h"
 #include "platform/core/Status.h"
 

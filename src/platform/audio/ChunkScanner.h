@@ -2,6 +2,7 @@
 // Published sources: EA IFF 85, AIFF 1.3 and AIFC, EBU Tech 3306 (RF64), ITU-R BS.2088 (BW64), the CAF specification.
 #pragma once
 
+#include "platform/StoredFormat.h"
 #include "platform/audio/HeaderWindow.h"
 #include "platform/core/FourCC.h"
 
@@ -12,8 +13,6 @@
 #include <vector>
 
 namespace platform {
-
-enum class ContainerKind : std::uint8_t { riff, iff, caf };
 
 /// 24 bytes a chunk: what a scan keeps.
 struct Chunk {

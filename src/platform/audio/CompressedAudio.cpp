@@ -106,15 +106,21 @@ FourCC fileTypeOf(ConvertingReader& reader, FourCC fileType)
 
 } // namespace
 
-std::int32_t describeCompressedAudio(const URL& url, BytesView start, CompressedAudio& audio)
+std::int32_t describePackets(const URL& url, CompressedAudio& audio)
 {
     audio = {};
     std::int32_t status = kStatusOK;
-    if (const auto packets = openPacketSource(url.posixPath(), &status)) {
-        audio = {packets->fileType(), packets->format(),
-                 static_cast<std::uint64_t>(std::max<std::int64_t>(packets->table().validFrames, 0))};
-        return kStatusOK;
-    }
+    const auto packets = openPacketSource(url.posixPath(), &status);
+    if (!packets)
+        return status;
+    audio = {packets->fileType(), packets->format(),
+             static_cast<std::uint64_t>(std::max<std::int64_t>(packets->table().validFrames, 0))};
+    return kStatusOK;
+}
+
+std::int32_t describeCompressedAudio(const URL& url, BytesView start, CompressedAudio& audio)
+{
+    std::int32_t status = describePackets(url, audio);
     if (status != AudioHandle::kFormatNotSupported)
         return status;
     audio.fileType = fileTypeOf(startBehindTags(url, start));

@@ -1,4 +1,4 @@
-#include "platform/audio/StoredFormat.h"
+#include "platform/StoredFormat.h"
 
 #include "platform/audio/AudioDescription.h"
 #include "platform/core/ByteReader.h"

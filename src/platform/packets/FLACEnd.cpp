@@ -1,4 +1,4 @@
-#include "platform/packets/FLACEnd.h"
+#include "platform/FLACEnd.h"
 
 #include "platform/core/Packed.h"
 

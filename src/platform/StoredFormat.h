@@ -5,12 +5,14 @@
 #pragma once
 
 #include "platform/AudioFileService.h"
-#include "platform/audio/ChunkScanner.h"
+#include "platform/core/Bytes.h"
 
 #include <cstdint>
 #include <optional>
 
 namespace platform {
+
+enum class ContainerKind : std::uint8_t { riff, iff, caf };
 
 struct StoredFormat {
     /// Of linear PCM bytesPerFrame is what a frame takes, 0 where that cannot be; samples fill their bytes from the

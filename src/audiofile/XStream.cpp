@@ -163,7 +163,7 @@ std::int32_t XStreamCreateWithFileRef(const CFileRef* folder, const char* name, 
 std::int32_t XStreamCloseFile(XStreamFileRef handle)
 {
     AudioHandle* file = fileOf(handle);
-    if (file == nullptr)
+    if (file == nullptr || file->isLent())
         return kStatusParameterError;
     delete file;
     return kStatusOK;

@@ -68,7 +68,7 @@ extern "C" {
 KT_EXPORT int32_t XStreamCreateWithFileRef(const CFileRef* folder, const char* name, uint32_t flags, uint32_t reserved1,
                                            uint32_t fileType, const XStreamDescription* format, uint32_t reserved2,
                                            uint32_t reserved3, XStreamFileRef* outFile);
-/// Closes what XStreamCreateWithFileRef made.
+/// Closes what XStreamCreateWithFileRef made; -50 for anything else, as for the file that a stream has open ("afil").
 KT_EXPORT int32_t XStreamCloseFile(XStreamFileRef file);
 /// Opens what the reference names, whose path must have at most 1,023 bytes; only the low byte of `flags` counts.
 KT_EXPORT int32_t XStreamOpenWithFileRef(const CFileRef* ref, uint32_t flags, uint32_t reserved1, uint32_t reserved2,

@@ -4,6 +4,8 @@
 
 #include <algorithm>
 #include <limits>
+#include <numeric>
+#include <vector>
 
 using platform::AudioFile;
 
@@ -35,10 +37,9 @@ bool VireoLoopUserDataUtils::write(AudioFile& file, FourCC type, std::uint32_t i
 
 bool VireoLoopUserDataUtils::removeAll(AudioFile& file, FourCC type)
 {
-    for (std::uint32_t left = count(file, type); left > 0; --left)
-        if (file.removeUserData(type, left - 1) != kStatusOK)
-            return false;
-    return true;
+    std::vector<std::uint32_t> indices(count(file, type));
+    std::iota(indices.begin(), indices.end(), std::uint32_t{0});
+    return indices.empty() || file.removeUserData(type, indices) == kStatusOK;
 }
 
 namespace {
@@ -83,9 +84,10 @@ bool VireoLoopUUIDUserDataUtils::write(AudioFile& file, const tagging::UUIDBytes
 
 bool VireoLoopUUIDUserDataUtils::removeAll(AudioFile& file, const tagging::UUIDBytes& uuid)
 {
-    // The last one first, so that a removal moves none that is still to be looked at.
-    for (std::uint32_t left = VireoLoopUserDataUtils::count(file, tagging::kCAFUUIDChunk); left > 0; --left)
-        if (hasUUID(file, left - 1, uuid) && file.removeUserData(tagging::kCAFUUIDChunk, left - 1) != kStatusOK)
-            return false;
-    return true;
+    const std::uint32_t count = VireoLoopUserDataUtils::count(file, tagging::kCAFUUIDChunk);
+    std::vector<std::uint32_t> indices;
+    for (std::uint32_t index = 0; index < count; ++index)
+        if (hasUUID(file, index, uuid))
+            indices.push_back(index);
+    return indices.empty() || file.removeUserData(tagging::kCAFUUIDChunk, indices) == kStatusOK;
 }

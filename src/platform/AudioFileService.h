@@ -11,6 +11,7 @@
 
 #include <cstdint>
 #include <memory>
+#include <span>
 
 namespace platform {
 
@@ -105,6 +106,9 @@ public:
     /// opens and holds the old item or the new one whenever the edit is cut short (docs/formats/user-data-edits.md).
     std::int32_t setUserData(FourCC type, std::uint32_t index, std::uint32_t size, const void* data);
     std::int32_t removeUserData(FourCC type, std::uint32_t index);
+    /// Removes the items at all these indices, which ascend, in one pass; the last ones go first. On failure some may
+    /// be gone.
+    std::int32_t removeUserData(FourCC type, std::span<const std::uint32_t> indices);
 
     /// The texts of the CAF "info" chunk, by key; empty when there is none. kStatusParameterError for other containers.
     std::int32_t information(Dictionary& information);

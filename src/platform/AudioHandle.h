@@ -21,6 +21,10 @@ public:
     AudioHandle(const AudioHandle&) = delete;
     AudioHandle& operator=(const AudioHandle&) = delete;
     Kind kind() const { return kind_; }
+    /// Whether it is part of another handle, which gives it out and ends it.
+    bool isLent() const { return isLent_; }
+    /// Said by the owner before anybody else sees it.
+    void lend() { isLent_ = true; }
 
     /// The size of a property's value, and whether it can be set.
     virtual std::int32_t propertyInfo(FourCC id, std::uint32_t& size, bool& isWritable) = 0;
@@ -36,6 +40,7 @@ protected:
 
 private:
     const Kind kind_;
+    bool isLent_ = false;
 };
 
 /// The object behind a handle (which must have been made from an `AudioHandle*`), when it is of the kind; else null.

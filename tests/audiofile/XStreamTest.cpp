@@ -42,6 +42,16 @@ struct Stream {
     Stream& operator=(const Stream&) = delete;
 };
 
+/// The file that the stream has open.
+XStreamFileRef lentBy(const Stream& stream)
+{
+    platform::AudioHandle* file = nullptr;
+    std::uint32_t size = sizeof file;
+    EXPECT_EQ(XStreamGetProperty(stream.handle, fourCC("afil"), &size, &file), 0);
+    EXPECT_NE(file, nullptr);
+    return file;
+}
+
 FourCC fileTypeOf(const Stream& stream)
 {
     FourCC type = 1;
@@ -164,6 +174,7 @@ TEST(XStream, ArgumentsThatAreMissing)
         XStreamClose(nullptr),
         XStreamCloseFile(nullptr),
         XStreamCloseFile(stream.handle),
+        XStreamCloseFile(lentBy(stream)),
         XStreamReadFrames(stream.handle, nullptr),
         XStreamReadFrames(nullptr, &request),
         XStreamReadFramesSync(nullptr, 0, 1, nullptr, memory, nullptr),

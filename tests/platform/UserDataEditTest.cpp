@@ -1,10 +1,12 @@
 // Edits of user data that are cut short at each single call, and what becomes of files edited again and again.
 #include "AudioContainers.h"
 #include "platform/core/Status.h"
+#include "support/FaultInjection.h"
 #include "support/FaultyDisk.h"
 
 #include <algorithm>
 #include <filesystem>
+#include <numeric>
 
 using namespace platform;
 
@@ -234,6 +236,57 @@ TEST(UserDataEdit, FilesDoNotGrowWithRepeatedEdits)
         EXPECT_LT(std::filesystem::file_size(path), 400u) << "filler at the end is cut off";
         walkContainer(readFile(path));
     }
+}
+
+TEST(UserDataEdit, ManyItemsAreRemovedInOnePass)
+{
+    constexpr std::uint32_t count = 8000;
+    for (const FourCC container : {fourCC("WAVE"), fourCC("AIFF"), fourCC("caff")})
+        for (const bool isApart : {false, true}) {
+            SCOPED_TRACE(fourCCText(container) + (isApart ? ", apart" : ", in a row"));
+            Chunks chunks{formatChunk(container), dataChunk(container)};
+            for (std::uint32_t i = 0; i < count; ++i) {
+                chunks.emplace_back(kItem, "item");
+                if (isApart || i + 1 == count)
+                    chunks.emplace_back(fourCC("cue "), "other");
+            }
+            TemporaryFolder folder;
+            const std::string path = folder.write("file", buildContainer(container, chunks));
+            const auto file = openAudio(path);
+            std::vector<std::uint32_t> indices(count - 1);
+            std::iota(indices.begin(), indices.end(), 1U);
+            FaultInjector faults;
+            EXPECT_EQ(file->removeUserData(kItem, indices), 0);
+            EXPECT_LE(faults.calls(Call::pread) + faults.calls(Call::pwrite), 3 * static_cast<int>(count));
+            EXPECT_EQ(itemsOf(*file, kItem).size(), 1U);
+            EXPECT_EQ(without(walkContainer(readFile(path)), kItem), without(chunks, kItem));
+        }
+}
+
+TEST(UserDataEdit, SeveralAreRemovedAsOneByOne)
+{
+    TemporaryFolder folder;
+    for (const FourCC container : {fourCC("WAVE"), fourCC("AIFF"), fourCC("caff")})
+        for (const char* order : {"FDIIII", "FIIDII", "FIfIDIoI", "FffIIfIoDIf"})
+            for (std::uint32_t mask = 0; mask < 16; ++mask) {
+                SCOPED_TRACE(fourCCText(container) + " " + order + " " + std::to_string(mask));
+                const Bytes content = build({"", container, order});
+                const auto together = openAudio(folder.write("together", content));
+                const auto single = openAudio(folder.write("single", content));
+                std::vector<std::uint32_t> indices;
+                for (std::uint32_t index = 0; index < 4; ++index)
+                    if ((mask >> index & 1) != 0)
+                        indices.push_back(index);
+                EXPECT_EQ(together->removeUserData(kItem, indices), 0);
+                for (auto index = indices.rbegin(); index != indices.rend(); ++index)
+                    EXPECT_EQ(single->removeUserData(kItem, *index), 0);
+                EXPECT_EQ(walkContainer(readFile(folder / "together")), walkContainer(readFile(folder / "single")));
+                EXPECT_EQ(itemsOf(*together, kItem), itemsOf(*single, kItem));
+            }
+    const auto file = openAudio(folder.write("file", build({"", fourCC("caff"), "FDIII"})));
+    for (const std::vector<std::uint32_t>& wrong : {std::vector{1U, 1U}, {2U, 0U}, {0U, 3U}})
+        EXPECT_EQ(file->removeUserData(kItem, wrong), kStatusParameterError);
+    EXPECT_EQ(itemsOf(*file, kItem).size(), 3U);
 }
 
 TEST(UserDataEdit, BytesBehindTheContainer)

@@ -8,6 +8,7 @@
 
 #include <cstdint>
 #include <optional>
+#include <span>
 #include <vector>
 
 namespace platform {
@@ -29,7 +30,8 @@ struct AudioFile::Implementation {
     std::int32_t findItem(FourCC type, std::uint32_t index, const Chunk*& chunk);
     std::int32_t checkEdit(FourCC type) const;
     std::int32_t setItem(FourCC type, std::uint32_t index, BytesView body);
-    std::int32_t removeItem(FourCC type, std::uint32_t index);
+    std::int32_t removeItem(FourCC type, std::uint32_t index) { return removeItems(type, {&index, 1}); }
+    std::int32_t removeItems(FourCC type, std::span<const std::uint32_t> indices);
 
     std::int32_t describe();
     std::int32_t extendAudio(std::uint64_t byteCount, std::uint64_t chunkSize);

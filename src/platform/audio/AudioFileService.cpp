@@ -8,6 +8,7 @@
 #include <algorithm>
 #include <array>
 #include <cstdio>
+#include <functional>
 #include <limits>
 
 namespace platform {
@@ -230,7 +231,7 @@ std::int32_t AudioFile::Implementation::setItem(FourCC type, std::uint32_t index
     return status;
 }
 
-std::int32_t AudioFile::Implementation::removeItem(FourCC type, std::uint32_t index)
+std::int32_t AudioFile::Implementation::removeItems(FourCC type, std::span<const std::uint32_t> indices)
 {
     std::int32_t status = checkEdit(type);
     if (status == kStatusOK)
@@ -238,9 +239,13 @@ std::int32_t AudioFile::Implementation::removeItem(FourCC type, std::uint32_t in
     if (status != kStatusOK)
         return status;
     const auto& found = itemsOf(type);
-    if (index >= found.size())
+    if (std::adjacent_find(indices.begin(), indices.end(), std::greater_equal<>()) != indices.end() ||
+        (!indices.empty() && indices.back() >= found.size()))
         return kStatusParameterError;
-    status = UserDataEditor(bytes, layout).remove(found[index]);
+    std::vector<std::size_t> chunks;
+    for (const std::uint32_t index : indices)
+        chunks.push_back(found[index]);
+    status = UserDataEditor(bytes, layout).remove(chunks);
     isStale = true;
     return status;
 }
@@ -293,6 +298,11 @@ std::int32_t AudioFile::setUserData(FourCC type, std::uint32_t index, std::uint3
 std::int32_t AudioFile::removeUserData(FourCC type, std::uint32_t index)
 {
     return implementation_->removeItem(type, index);
+}
+
+std::int32_t AudioFile::removeUserData(FourCC type, std::span<const std::uint32_t> indices)
+{
+    return implementation_->removeItems(type, indices);
 }
 
 } // namespace platform

@@ -52,6 +52,7 @@ LinearPCMDecoder::LinearPCMDecoder(std::unique_ptr<AudioFile> file, const Stream
       frameFormat_(frameFormatOf(fileFormat)),
       frameCount_(frameCount)
 {
+    file_->lend();
 }
 
 std::int32_t LinearPCMDecoder::seek(std::uint64_t frame)

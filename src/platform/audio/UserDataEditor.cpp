@@ -46,9 +46,9 @@ std::int32_t UserDataEditor::append(FourCC id, BytesView body)
     return body.size() > layout_.largestChunk() ? kStatusFileTooBig : finish(appendContent({{id, body.size(), body}}));
 }
 
-std::int32_t UserDataEditor::remove(std::size_t chunk)
+std::int32_t UserDataEditor::remove(const std::vector<std::size_t>& chunks)
 {
-    return finish(hide(chunk));
+    return finish(hideAll(chunks));
 }
 
 // What chunks are to an edit.
@@ -92,9 +92,9 @@ bool UserDataEditor::canBeFiller(std::uint64_t position, std::uint64_t end, std:
 {
     if (layout_.padOf(end - position) == 0)
         return true;
-    const auto next = std::find_if(layout_.chunks.begin(), layout_.chunks.end(),
-                                   [end](const Chunk& chunk) { return chunk.position == end; });
-    if (!nextId && next != layout_.chunks.end())
+    const auto next = std::lower_bound(layout_.chunks.begin(), layout_.chunks.end(), end,
+                                       [](const Chunk& chunk, std::uint64_t place) { return chunk.position < place; });
+    if (!nextId && next != layout_.chunks.end() && next->position == end)
         nextId = next->id;
     return !nextId || *nextId >> 24 != 0;
 }
@@ -349,9 +349,32 @@ std::int32_t UserDataEditor::appendContent(const Content& content)
 /// Makes filler of a chunk, and one filler of it and its neighbours.
 std::int32_t UserDataEditor::hide(std::size_t chunk)
 {
-    Run hidden = runAround(chunk);
-    if (hidden.end - hidden.position > layout_.largestChunk() || !canBeFiller(hidden.position, hidden.end))
-        hidden = run(chunk, chunk + 1);
+    return hideAll({chunk});
+}
+
+/// Chunks that stand in a row, with nothing but filler between them, become one filler by a single header.
+std::int32_t UserDataEditor::hideAll(const std::vector<std::size_t>& chunks)
+{
+    std::int32_t status = kStatusOK;
+    for (std::size_t left = chunks.size(); left > 0 && status == kStatusOK;) {
+        const std::size_t past = runAround(chunks[left - 1]).past;
+        std::size_t first = runAround(chunks[--left]).first;
+        const std::size_t last = left;
+        for (; left > 0 && chunks[left - 1] + 1 == first; --left)
+            first = runAround(chunks[left - 1]).first;
+        const Run row = run(first, past);
+        if (row.end - row.position <= layout_.largestChunk() && canBeFiller(row.position, row.end)) {
+            status = hideRun(row);
+            continue;
+        }
+        for (std::size_t i = last + 1; i-- > left && status == kStatusOK;)
+            status = hideRun(run(chunks[i], chunks[i] + 1));
+    }
+    return status;
+}
+
+std::int32_t UserDataEditor::hideRun(const Run& hidden)
+{
     const std::uint64_t size = hidden.end - hidden.position - layout_.headerSize();
     return size <= layout_.largestChunk() ? writeHeader(hidden.position, ContainerLayout::filler, size)
                                           : kStatusFileTooBig;

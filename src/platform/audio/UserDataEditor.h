@@ -26,7 +26,8 @@ public:
     std::int32_t replace(std::size_t chunk, BytesView body);
     /// Adds a chunk behind all those of its type.
     std::int32_t append(FourCC id, BytesView body);
-    std::int32_t remove(std::size_t chunk);
+    /// Removes the chunks at these places, which ascend; the last ones go first.
+    std::int32_t remove(const std::vector<std::size_t>& chunks);
 
 private:
     /// A chunk to be written: a new one, or one of the file that changes its place.
@@ -66,6 +67,8 @@ private:
     std::size_t nextOfType(std::size_t from, FourCC id) const;
     std::int32_t appendContent(const Content& content);
     std::int32_t hide(std::size_t chunk);
+    std::int32_t hideAll(const std::vector<std::size_t>& chunks);
+    std::int32_t hideRun(const Run& hidden);
     std::int32_t grow(std::uint64_t extent);
     std::int32_t mergeFiller(const Run& filler);
     std::int32_t writeHeader(std::uint64_t position, FourCC id, std::uint64_t size);

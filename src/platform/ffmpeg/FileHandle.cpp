@@ -10,6 +10,7 @@ FileHandle::FileHandle(FourCC type, const StreamDescription& format, std::uint64
       format_(format),
       packetCount_(packetCount)
 {
+    lend();
 }
 
 std::int32_t FileHandle::propertyInfo(FourCC id, std::uint32_t& size, bool& isWritable)

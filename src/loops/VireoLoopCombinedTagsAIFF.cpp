@@ -119,7 +119,8 @@ BasicTaggingChunk basicTaggingOf(const Dictionary& tags)
 {
     const auto number16 = [&](const char* key) { return static_cast<std::int16_t>(numberFor(tags, key)); };
     BasicTaggingChunk basic;
-    basic.beatCount = static_cast<std::int32_t>(numberFor(tags, VireoLoopCombinedTagsChunkDataBeatCountKey));
+    basic.beatCount = static_cast<std::int32_t>(
+        std::clamp<std::int64_t>(numberFor(tags, VireoLoopCombinedTagsChunkDataBeatCountKey), INT32_MIN, INT32_MAX));
     basic.midiRootNote = number16(VireoLoopCombinedTagsChunkDataMidiRootNoteKey);
     basic.keyType = number16(VireoLoopCombinedTagsChunkDataKeyType);
     basic.signatureTop = number16(VireoLoopCombinedTagsChunkDataSignatureTopKey);

@@ -124,7 +124,7 @@ Dictionary VireoLoopCombinedTagsChunkDataTypes::combinedTagsChunkDataDictionaryF
     }
 
     const std::string* beats = firstOf(info, "beat count");
-    const std::int32_t beatCount = beats != nullptr ? tagging::NumberAtStartOf(*beats) : 0;
+    const std::int64_t beatCount = beats != nullptr ? tagging::LongNumberAtStartOf(*beats) : 0;
     const std::string* signature = firstOf(info, "time signature");
     const auto [top, bottom] = tagging::TimeSignatureIn(signature != nullptr ? *signature : "");
     tags[VireoLoopCombinedTagsChunkDataMidiRootNoteKey] = rootNoteKeyFromCafDict(info);

@@ -1,5 +1,6 @@
 // What opening a file tells of the loop, and the frame positions of its transients, stored without the object layer.
 #include "audiofile/CAudioFileIO.h"
+#include "loops/VireoLoopCombinedTagsChunkDataTypes.h"
 #include "loops/VireoLoopTransients.h"
 #include "loops/tagging/CAFPayloads.h"
 #include "loops/tagging/Chunks.h"
@@ -156,3 +157,12 @@ TEST_F(LoopTransients, InCAFReplaceTheItemOfTheirUUID)
 }
 
 } // namespace
+
+TEST(LoopTiming, ABeatCountIsReadAsItWasWritten)
+{
+    using Types = VireoLoopCombinedTagsChunkDataTypes;
+    const platform::Dictionary tags{{VireoLoopCombinedTagsChunkDataBeatCountKey, std::int64_t{5'000'000'000}}};
+    const auto written = Types::cafChunkDataFromCombinedTagsChunkDataDictionary(tags);
+    const auto read = Types::combinedTagsChunkDataDictionaryFromCafChunkData(written.value());
+    EXPECT_EQ(*platform::find<std::int64_t>(read, VireoLoopCombinedTagsChunkDataBeatCountKey), 5'000'000'000);
+}

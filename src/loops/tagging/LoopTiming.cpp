@@ -39,13 +39,18 @@ std::optional<LoopTiming> LoopTimingInCAF(BytesView payload)
 
 std::int32_t NumberAtStartOf(std::string_view text)
 {
+    return static_cast<std::int32_t>(std::clamp<std::int64_t>(LongNumberAtStartOf(text), INT32_MIN, INT32_MAX));
+}
+
+std::int64_t LongNumberAtStartOf(std::string_view text)
+{
     text.remove_prefix(std::min(text.find_first_not_of(" \t"), text.size()));
     if (text.starts_with('+'))
         text.remove_prefix(1);
-    std::int32_t number = 0;
+    std::int64_t number = 0;
     const auto result = std::from_chars(text.data(), text.data() + text.size(), number);
     if (result.ec == std::errc::result_out_of_range)
-        return text.starts_with('-') ? INT32_MIN : INT32_MAX;
+        return text.starts_with('-') ? INT64_MIN : INT64_MAX;
     return number;
 }
 

@@ -27,6 +27,8 @@ std::optional<LoopTiming> LoopTimingInCAF(BytesView payload);
 
 /// The number that a text begins with; 0 when it begins with none, the nearest 32-bit number when it is larger.
 std::int32_t NumberAtStartOf(std::string_view text);
+/// The same with 64 bits.
+std::int64_t LongNumberAtStartOf(std::string_view text);
 /// Of a text such as "6/8"; zeros when it is none.
 TimeSignature TimeSignatureIn(std::string_view text);
 

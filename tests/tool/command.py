@@ -17,8 +17,10 @@ os.environ["KTFILES_COORDINATION"] = tempfile.mkdtemp(prefix="ktfiles-coordinati
 atexit.register(shutil.rmtree, os.environ["KTFILES_COORDINATION"], ignore_errors=True)
 MEDIA = pathlib.Path(os.environ["KTFILES_MEDIA"])
 # What the command is linked to.
-LIBRARY = pathlib.Path(re.search(r"=> (\S*/libKTFiles\.so\S*)",
-                                 subprocess.run(["ldd", KTFILES], capture_output=True, text=True).stdout).group(1))
+LINKED = subprocess.run(["ldd", KTFILES], capture_output=True, text=True).stdout
+LIBRARY = pathlib.Path(re.search(r"=> (\S*/libKTFiles\.so\S*)", LINKED).group(1))
+# With a sanitizer, which reserves more memory than a limit would leave.
+INSTRUMENTED = re.search("libasan|libtsan", LINKED) is not None
 needs_decoders = unittest.skipUnless((LIBRARY.parent / "ktfiles/libktfiles-decoders.so").exists(),
                                      "the decoder module is not built")
 

@@ -1,5 +1,5 @@
 // The chunks of a container in file order: the service's own scanner, for WAVE (RIFF, RF64, BW64), AIFF, AIFC and CAF.
-// Published sources: EA IFF 85, AIFF 1.3 and AIFC, EBU Tech 3306 (RF64), ITU-R BS.2088 (BW64), the CAF specification.
+// Published sources: EA IFF 85, AIFF 1.3 and AIFC, EBU Tech 3306 (RF64), ITU-R BS.2088 (BW64), CAF 1.0.
 #pragma once
 
 #include "platform/StoredFormat.h"

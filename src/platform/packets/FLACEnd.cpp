@@ -47,7 +47,7 @@ std::optional<std::uint64_t> endOfFrame(BytesView bytes, std::uint32_t blockSize
     const std::size_t length = ones == 0 ? 1 : static_cast<std::size_t>(ones);
     if (ones == 1 || ones == 8 || bytes.size() < kFixedSize + length + 3)
         return {};
-    std::uint64_t number = ones == 0 ? first : first & (0x7F >> ones);
+    std::uint64_t number = ones == 0 ? first : first & (0x7FU >> ones);
     std::size_t at = kFixedSize + 1;
     for (; at < kFixedSize + length; ++at)
         number = number << 6 | (std::to_integer<std::uint64_t>(bytes[at]) & 0x3F);

@@ -190,7 +190,7 @@ Bytes flacOfChangingBlocks(const std::vector<std::int16_t>& samples)
     append(file, 6000, 2);                // and the largest
     append(file, 0, 6);                   // frames of any size
     append(file, std::uint64_t{44100} << 44 | std::uint64_t{15} << 36 | samples.size(), 8);
-    append(file, 0, 16); // no MD5
+    file.resize(file.size() + 16); // no MD5
     std::mt19937 random(7);
     for (std::size_t at = 0; at < samples.size();) {
         const std::size_t count = std::min<std::size_t>(16 + random() % 5985, samples.size() - at);

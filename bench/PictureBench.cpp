@@ -2,8 +2,8 @@
 // time, and from that of 12 hours, which is there.
 #include "audiofile/CAudioFileIO.h"
 #include "loops/overview/StoredOverview.h"
-#include "tool/PNGPicture.h"
-#include "tool/SVGPicture.h"
+#include "tool/overview/PNGPicture.h"
+#include "tool/overview/SVGPicture.h"
 
 #include <benchmark/benchmark.h>
 

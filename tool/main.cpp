@@ -1,7 +1,7 @@
 // The command `ktfiles`. Each verb is a file of its own, and registers itself with the command line.
-#include "CommandLine.h"
-#include "CoordinationFolder.h"
 #include "platform/Log.h"
+#include "tool/shared/arguments/CommandLine.h"
+#include "tool/shared/arguments/CoordinationFolder.h"
 
 #include <csignal>
 #include <fcntl.h>

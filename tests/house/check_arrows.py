@@ -72,10 +72,22 @@ def room_depth(room):
     return room.count("/") + 1
 
 
+def tool_folder(path):
+    """The folder of a path in tool/ that speaks for it: a verb's, or "shared" with all below; "" for main.cpp."""
+    return path.split("/")[1] if path.count("/") > 1 else ""
+
+
 def tool_problems(source, top, public):
+    """A verb of the command knows the public headers, its own folder and tool/shared; tool/shared knows no verb."""
+    relative = source.relative_to(top).as_posix()
     for ours, _ in INCLUDE.findall(source.read_text(encoding="utf-8")):
-        if ours and not (source.parent / ours).exists() and ours not in public:
-            yield f"{source.relative_to(top)}: {ours} is no public header"
+        if ours.startswith("tool/") and relative.startswith("tool/"):
+            if tool_folder(ours) not in (tool_folder(relative), "shared"):
+                yield f"{relative}: {ours} belongs to another verb"
+            elif not (top / ours).exists():
+                yield f"{relative}: there is no {ours}"
+        elif ours and ours not in public:
+            yield f"{relative}: {ours} is no public header"
 
 
 def main():

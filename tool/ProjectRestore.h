@@ -1,9 +1,0 @@
-// Exchanging an alternative's data with a backup's, and settling an exchange that was cut short.
-#pragma once
-
-#include "Output.h"
-#include "ProjectArguments.h"
-
-/// These throw Failure.
-void restoreBackup(const ProjectArguments& arguments, const OutputOptions& output);
-void settleExchange(const ProjectArguments& arguments, const OutputOptions& output);

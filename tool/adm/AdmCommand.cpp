@@ -1,0 +1,248 @@
+// ktfiles adm: what an ADM document describes, as a tree or as JSON, and what is wrong with it.
+#include "tool/adm/AdmCheck.h"
+#include "tool/adm/AdmJson.h"
+#include "tool/adm/AdmSource.h"
+#include "tool/adm/AdmTree.h"
+#include "tool/shared/access/FileAccess.h"
+#include "tool/shared/arguments/CommandLine.h"
+#include "tool/shared/output/Failure.h"
+#include "tool/shared/output/JsonWriter.h"
+#include "tool/shared/output/Progress.h"
+
+#include <nlohmann/json.hpp>
+
+#include <limits>
+
+namespace {
+
+constexpr std::size_t kFewBlocks = 5;
+constexpr std::size_t kFewDiagnostics = 10;
+
+struct AdmArguments {
+    std::vector<std::string> files;
+    bool isLenient = false;
+    bool isCheck = false;
+    bool isLong = false;
+};
+
+/// A document, and what was said about it.
+struct ReadDocument {
+    std::unique_ptr<ADMDocument> document;
+    std::vector<ADMDiagnostic> diagnostics;
+    bool isComplete = false; // it went through to its end, which strict rules may forbid
+};
+
+ADMDocumentOptions optionsFor(const AdmArguments& arguments)
+{
+    // A check goes past a problem wherever that can be done, to find the others.
+    return {.continuePastUnresolvedReferences = arguments.isLenient || arguments.isCheck,
+            .skipUnsupportedBlocks = arguments.isLenient || arguments.isCheck,
+            .silentTrack = arguments.isLenient,
+            .exactFractions = arguments.isLenient};
+}
+
+enum class Diagnose : bool { no, yes };
+
+/// Throws the Failure of a file that cannot be read, but not for what is wrong with the document.
+ReadDocument readDocument(AdmSource& source, const AdmArguments& arguments, bool quiet, Diagnose diagnose)
+{
+    ReadDocument read;
+    read.document = std::make_unique<ADMDocument>(nullptr);
+    read.document->setOptions(optionsFor(arguments));
+    if (diagnose == Diagnose::yes)
+        read.document->setDiagnosticsHandler([&read](const ADMDiagnostic& told) {
+            read.diagnostics.push_back({told.position, told.kind, shortened(told.elementID), told.text});
+        });
+    Progress progress("reading", source.size(), quiet);
+    std::uint64_t done = 0;
+    read.document->setProgressHandler([&](std::uint64_t bytes) {
+        progress.advance(static_cast<std::int64_t>(bytes - done));
+        done = bytes;
+        return true;
+    });
+    const auto stream = source.stream();
+    try {
+        read.isComplete = read.document->parseStream(*stream);
+    } catch (const ADMException&) {
+        // The handler has heard of it, and with its place.
+    }
+    read.document->setDiagnosticsHandler(nullptr);
+    read.document->setProgressHandler(nullptr);
+    if (const platform::Error* error = read.document->parseError();
+        error != nullptr && error->domain == platform::ErrorDomain::status)
+        throw Failure(error->description);
+    return read;
+}
+
+std::string problemText(const ADMDiagnostic& diagnostic)
+{
+    return diagnostic.kind + ": " + diagnostic.text;
+}
+
+/// "FILE:LINE:COLUMN", as programs that go to such places expect it; the file alone for what has no place in it.
+std::string placeText(const std::string& path, const ADMDiagnostic& diagnostic)
+{
+    if (diagnostic.position.line == 0)
+        return path;
+    return fmt::format("{}:{}:{}", path, diagnostic.position.line, diagnostic.position.column);
+}
+
+class AdmCommand {
+public:
+    AdmCommand(const AdmArguments& arguments, const OutputOptions& options)
+        : arguments_(arguments),
+          options_(options),
+          form_(outputForm(options))
+    {
+    }
+
+    bool run()
+    {
+        const bool isArray = form_ == Form::json && arguments_.files.size() > 1;
+        bool good = true;
+        output_.write(isArray ? "[\n" : "");
+        for (const std::string& path : arguments_.files) {
+            if (output_.failed())
+                break;
+            if (&path != &arguments_.files.front())
+                output_.write(isArray ? ",\n" : form_ == Form::table && !arguments_.isCheck ? "\n" : "");
+            if (!runFile(path))
+                good = false;
+        }
+        output_.write(isArray ? "\n]\n" : form_ == Form::json ? "\n" : "");
+        return good;
+    }
+
+private:
+    bool runFile(const std::string& path)
+    {
+        try {
+            const FileAccess access = accessForReading(path, {.quiet = options_.quiet});
+            const bool tells = arguments_.isCheck || arguments_.isLenient;
+            AdmSource source(path);
+            ReadDocument read = readDocument(source, arguments_, options_.quiet, tells ? Diagnose::yes : Diagnose::no);
+            // To know the place of everything costs a ninth of the time, which only documents with a problem pay.
+            if (!read.isComplete && !tells)
+                read = readDocument(source, arguments_, options_.quiet, Diagnose::yes);
+            if (arguments_.isCheck) {
+                for (ADMDiagnostic& problem : checkFurther(source, *read.document, read.isComplete))
+                    read.diagnostics.push_back(std::move(problem));
+                return check(path, read);
+            }
+            if (!read.isComplete) {
+                const ADMDiagnostic last = read.diagnostics.back();
+                read.diagnostics.pop_back();
+                reportDiagnostics(path, read.diagnostics);
+                return fail(path, last);
+            }
+            show(path, read);
+            return true;
+        } catch (const Failure& failure) {
+            return fail(path, path, failure.what());
+        }
+    }
+
+    bool fail(const std::string& path, const ADMDiagnostic& problem)
+    {
+        return fail(path, placeText(path, problem), problemText(problem));
+    }
+
+    bool fail(const std::string& path, const std::string& place, const std::string& text)
+    {
+        reportFailure(place, text);
+        if (form_ == Form::json)
+            output_.write(jsonText({{"path", path}, {"error", text}}));
+        return false;
+    }
+
+    bool check(const std::string& path, const ReadDocument& read)
+    {
+        if (form_ == Form::json) {
+            JsonWriter json(output_);
+            json.beginObject();
+            json.member("path", path);
+            json.key("problems");
+            writeDiagnostics(json, read.diagnostics);
+            json.endObject();
+        } else if (form_ != Form::none) {
+            for (const ADMDiagnostic& diagnostic : read.diagnostics)
+                output_.print("{}: {}\n", printable(placeText(path, diagnostic)), printable(problemText(diagnostic)));
+        }
+        return read.diagnostics.empty();
+    }
+
+    void show(const std::string& path, const ReadDocument& read)
+    {
+        if (form_ == Form::json) {
+            writeAdmJson(output_, path, *read.document, arguments_.isLenient ? &read.diagnostics : nullptr);
+            return;
+        }
+        if (form_ == Form::table)
+            showTitle(path, *read.document);
+        if (form_ != Form::none) {
+            const bool isDrawn = form_ == Form::table;
+            const bool isPrefixed = !isDrawn && arguments_.files.size() > 1;
+            AdmTreeWriter writer(output_, {.isDrawn = isDrawn,
+                                           .hasColor = usesColor(options_.color),
+                                           .hasBlockIDs = arguments_.isLong,
+                                           .columns = terminalColumns(),
+                                           .linePrefix = isPrefixed ? printable(path) + "\t" : ""});
+            const bool hasAll = arguments_.isLong || !isDrawn;
+            AdmTree(writer, hasAll ? std::numeric_limits<std::size_t>::max() - 1 : kFewBlocks).show(*read.document);
+        }
+        reportDiagnostics(path, read.diagnostics);
+    }
+
+    void showTitle(const std::string& path, const ADMDocument& document)
+    {
+        std::string text;
+        const auto add = [&](std::size_t count, std::string_view noun) {
+            if (count > 0)
+                text += (text.empty() ? "" : ", ") + countText(count, noun);
+        };
+        std::size_t blocks = 0;
+        for (const ADMAudioChannelFormat& channel : document.audioChannelFormats())
+            blocks += channel.audioBlockFormat().size();
+        add(document.audioProgrammes().size(), "programme");
+        add(document.audioContents().size(), "content");
+        add(document.audioObjects().size(), "object");
+        add(document.audioTrackUIDs().size(), "track");
+        add(document.audioChannelFormats().size(), "channel");
+        add(blocks, "block");
+        output_.print("{}: {}\n", printable(path), text.empty() ? "no ADM elements" : text);
+    }
+
+    /// What was let pass. On standard error, since standard output has a form of its own to keep.
+    void reportDiagnostics(const std::string& path, const std::vector<ADMDiagnostic>& diagnostics)
+    {
+        if (options_.quiet || diagnostics.empty())
+            return;
+        output_.flush();
+        const bool hasAll = arguments_.isLong || form_ != Form::table || diagnostics.size() <= kFewDiagnostics + 1;
+        const std::size_t count = hasAll ? diagnostics.size() : kFewDiagnostics;
+        for (std::size_t i = 0; i < count; ++i)
+            reportFailure(placeText(path, diagnostics[i]), problemText(diagnostics[i]));
+        if (count < diagnostics.size())
+            reportFailure(path, countText(diagnostics.size() - count, "more"));
+    }
+
+    const AdmArguments& arguments_;
+    const OutputOptions& options_;
+    Form form_;
+    Output& output_ = Output::standard();
+};
+
+void declareAdm(CommandLine& commandLine)
+{
+    static AdmArguments arguments;
+    CLI::App& verb = commandLine.addVerb("adm", "Show what the ADM documents of audio files, or in XML files, describe",
+                                         [&commandLine] { return AdmCommand(arguments, commandLine.output()).run(); });
+    CommandLine::addFiles(verb, arguments.files)->required()->description("Audio files and XML files");
+    verb.add_flag("--long", arguments.isLong, "Show every block, with its ID");
+    verb.add_flag("--lenient", arguments.isLenient, "Let pass what can be passed over, and list it");
+    verb.add_flag("--check", arguments.isCheck, "Print only what is wrong: FILE:LINE:COLUMN: NAME: REASON");
+}
+
+const VerbRegistration registration{60, declareAdm};
+
+} // namespace

@@ -1,0 +1,250 @@
+#include "tool/adm/AdmJson.h"
+
+#include "adm/ADMAudioBlockFormat_DirectSpeaker.h"
+#include "adm/ADMAudioBlockFormat_Object.h"
+#include "tool/adm/AdmWords.h"
+#include "tool/shared/output/JsonWriter.h"
+
+namespace {
+
+std::optional<std::int64_t> timeOrNull(std::int64_t microseconds)
+{
+    return microseconds == kADMInvalidTime ? std::nullopt : std::optional(microseconds);
+}
+
+void writeLabels(JsonWriter& json, std::string_view key, const ADMLabels& labels)
+{
+    json.key(key);
+    json.beginObject();
+    for (const auto& [language, text] : labels)
+        json.member(language, text);
+    json.endObject();
+}
+
+void writePosition(JsonWriter& json, const ADMPosition& position)
+{
+    json.key("position");
+    json.beginObject();
+    json.member("cartesian", position.cartesian);
+    json.member("X", position.X);
+    json.member("Y", position.Y);
+    json.member("Z", position.Z);
+    json.member("azimuth", position.azimuth);
+    json.member("elevation", position.elevation);
+    json.member("distance", position.distance);
+    json.endObject();
+}
+
+void writeMembers(JsonWriter& json, const ADMAudioProgramme& programme)
+{
+    json.member("audioProgrammeID", programme.audioProgrammeID());
+    json.member("index", programme.index());
+    json.member("audioProgrammeName", programme.audioProgrammeName());
+    json.member("audioProgrammeLanguage", programme.audioProgrammeLanguage());
+    json.member("start", timeOrNull(programme.exactStart()));
+    json.member("end", timeOrNull(programme.exactEnd()));
+    json.member("maxDuckingDepth", programme.maxDuckingDepth());
+    json.member("audioContentIDs", programme.audioContentIDs());
+    writeLabels(json, "audioProgrammeLabels", programme.audioProgrammeLabels());
+}
+
+void writeMembers(JsonWriter& json, const ADMAudioContent& content)
+{
+    json.member("audioContentID", content.audioContentID());
+    json.member("index", content.index());
+    json.member("audioContentName", content.audioContentName());
+    json.member("audioContentLanguage", content.audioContentLanguage());
+    json.member("audioObjectIDRefs", content.audioObjectIDRefs());
+    writeLabels(json, "audioContentLabels", content.audioContentLabels());
+    json.member("dialogueMode", content.dialogueMode());
+    json.member("nonDialogueContentKind", content.nonDialogueContentKind());
+    json.member("dialogueContentKind", content.dialogueContentKind());
+    json.member("mixedContentKind", content.mixedContentKind());
+}
+
+void writeMembers(JsonWriter& json, const ADMAudioObject& object)
+{
+    json.member("audioObjectID", object.audioObjectID());
+    json.member("audioObjectName", object.audioObjectName());
+    json.member("start", timeOrNull(object.exactStart()));
+    json.member("duration", timeOrNull(object.exactDuration()));
+    json.member("dialogueMode", object.dialogueMode());
+    json.member("importance", object.importance());
+    json.member("interact", object.interact());
+    json.member("disallowDucking", object.disallowDucking());
+    json.member("audioPackFormatIDRefs", object.audioPackFormatIDRefs());
+    json.member("audioObjectIDRefs", object.audioObjectIDRefs());
+    json.member("audioTrackUIDRefs", object.audioTrackUIDRefs());
+    writeLabels(json, "audioObjectLabels", object.audioObjectLabels());
+    json.member("gain", object.gain());
+    json.member("gainUnit", object.gainUnit());
+    json.member("headLocked", object.headLocked());
+    json.member("mute", object.mute());
+    json.key("polarOffset");
+    json.beginObject();
+    json.member("azimuth", object.polarOffset().azimuth);
+    json.member("elevation", object.polarOffset().elevation);
+    json.member("distance", object.polarOffset().distance);
+    json.endObject();
+    json.key("cartesianOffset");
+    json.beginObject();
+    json.member("X", object.cartesianOffset().X);
+    json.member("Y", object.cartesianOffset().Y);
+    json.member("Z", object.cartesianOffset().Z);
+    json.endObject();
+}
+
+void writeMembers(JsonWriter& json, const ADMAudioPackFormat& pack)
+{
+    json.member("audioPackFormatID", pack.audioPackFormatID());
+    json.member("audioPackFormatName", pack.audioPackFormatName());
+    json.member("type", pack.type());
+    json.member("importance", signedImportance(pack));
+    json.member("absoluteDistance", pack.absoluteDistance());
+    json.member("audioChannelFormatIDRefs", pack.audioChannelFormatIDRefs());
+    json.member("audioPackFormatIDRefs", pack.audioPackFormatIDRefs());
+}
+
+void writeObjectBlock(JsonWriter& json, const ADMAudioBlockFormat_Object& block)
+{
+    writePosition(json, block.position());
+    json.member("hasCartesianX", block.hasCartesianX());
+    json.member("hasCartesianY", block.hasCartesianY());
+    json.member("hasCartesianZ", block.hasCartesianZ());
+    json.member("hasPolarAzimuth", block.hasPolarAzimuth());
+    json.member("hasPolarElevation", block.hasPolarElevation());
+    json.member("hasPolarDistance", block.hasPolarDistance());
+    json.member("width", block.width());
+    json.member("height", block.height());
+    json.member("depth", block.depth());
+    json.member("hasWidth", block.hasWidth());
+    json.member("hasHeight", block.hasHeight());
+    json.member("hasDepth", block.hasDepth());
+    json.member("diffuse", block.diffuse());
+    json.member("jumpPosition", block.jumpPosition());
+    json.member("interpolationLength", block.interpolationLength());
+    json.member("screenRef", block.screenRef());
+}
+
+void writeBlock(JsonWriter& json, const ADMAudioBlockFormat& block)
+{
+    json.newLine();
+    json.beginObject();
+    json.member("audioBlockFormatID", block.audioBlockFormatID());
+    json.member("type", block.type());
+    json.member("index", block.index());
+    json.member("blockIndex", block.blockIndex());
+    json.member("rtime", timeOrNull(block.exactRtime()));
+    json.member("duration", timeOrNull(block.exactDuration()));
+    json.member("hasGain", block.hasGain());
+    json.member("gain", block.gain());
+    json.member("gainUnit", block.gainUnit());
+    json.member("importance", block.importance());
+    json.member("headLocked", block.headLocked());
+    json.member("headphoneVirtualize", block.headphoneVirtualize());
+    if (const auto* object = dynamic_cast<const ADMAudioBlockFormat_Object*>(&block)) {
+        writeObjectBlock(json, *object);
+    } else if (const auto* speaker = dynamic_cast<const ADMAudioBlockFormat_DirectSpeaker*>(&block)) {
+        json.member("speakerLabel", speaker->speakerLabel());
+        writePosition(json, speaker->position());
+    }
+    json.endObject();
+}
+
+void writeMembers(JsonWriter& json, const ADMAudioChannelFormat& channel)
+{
+    json.member("audioChannelFormatID", channel.audioChannelFormatID());
+    json.member("audioChannelFormatName", channel.audioChannelFormatName());
+    json.member("type", channel.type());
+    json.key("audioBlockFormat");
+    json.beginArray();
+    for (const auto& block : channel.audioBlockFormat())
+        writeBlock(json, *block);
+    json.endArray();
+}
+
+void writeMembers(JsonWriter& json, const ADMAudioStreamFormat& stream)
+{
+    json.member("audioStreamFormatID", stream.audioStreamFormatID());
+    json.member("audioStreamFormatName", stream.audioStreamFormatName());
+    json.member("format", stream.format());
+    json.member("audioChannelFormatIDRef", stream.audioChannelFormatIDRef());
+    json.member("audioPackFormatIDRef", stream.audioPackFormatIDRef());
+    json.member("audioTrackFormatIDRefs", stream.audioTrackFormatIDRefs());
+}
+
+void writeMembers(JsonWriter& json, const ADMAudioTrackFormat& track)
+{
+    json.member("audioTrackFormatID", track.audioTrackFormatID());
+    json.member("audioTrackFormatName", track.audioTrackFormatName());
+    json.member("formatLabel", track.formatLabel());
+    json.member("formatDefinition", track.formatDefinition());
+    json.member("audioStreamFormatRefID", track.audioStreamFormatRefID());
+    json.member("formatIDRefs", track.formatIDRefs());
+}
+
+void writeMembers(JsonWriter& json, const ADMAudioTrackUID& track)
+{
+    json.member("audioTrackUIDID", track.audioTrackUIDID());
+    json.member("index", track.index());
+    json.member("sampleRate", track.sampleRate());
+    json.member("bitDepth", track.bitDepth());
+    json.member("audioTrackFormatIDRef", track.audioTrackFormatIDRef());
+    json.member("audioChannelFormatIDRef", track.audioChannelFormatIDRef());
+    json.member("audioPackFormatIDRef", track.audioPackFormatIDRef());
+}
+
+template <class Element>
+void writeElements(JsonWriter& json, std::string_view key, const ADMElementTable<Element>& elements)
+{
+    json.newLine();
+    json.key(key);
+    json.beginArray();
+    for (const Element& element : elements) {
+        json.newLine();
+        json.beginObject();
+        writeMembers(json, element);
+        json.endObject();
+    }
+    json.endArray();
+}
+
+} // namespace
+
+void writeAdmJson(Output& output, const std::string& path, const ADMDocument& document,
+                  const std::vector<ADMDiagnostic>* diagnostics)
+{
+    JsonWriter json(output);
+    json.beginObject();
+    json.member("path", path);
+    writeElements(json, "programmes", document.audioProgrammes());
+    writeElements(json, "contents", document.audioContents());
+    writeElements(json, "objects", document.audioObjects());
+    writeElements(json, "packFormats", document.audioPackFormats());
+    writeElements(json, "channelFormats", document.audioChannelFormats());
+    writeElements(json, "streamFormats", document.audioStreamFormats());
+    writeElements(json, "trackFormats", document.audioTrackFormats());
+    writeElements(json, "trackUIDs", document.audioTrackUIDs());
+    if (diagnostics != nullptr) {
+        json.newLine();
+        json.key("diagnostics");
+        writeDiagnostics(json, *diagnostics);
+    }
+    json.endObject();
+}
+
+void writeDiagnostics(JsonWriter& json, const std::vector<ADMDiagnostic>& diagnostics)
+{
+    json.beginArray();
+    for (const ADMDiagnostic& diagnostic : diagnostics) {
+        json.newLine();
+        json.beginObject();
+        json.member("line", diagnostic.position.line);
+        json.member("column", diagnostic.position.column);
+        json.member("name", diagnostic.kind);
+        json.member("elementID", diagnostic.elementID);
+        json.member("reason", diagnostic.text);
+        json.endObject();
+    }
+    json.endArray();
+}

@@ -1,0 +1,18 @@
+// An ADM document as JSON.
+#pragma once
+
+#include "adm/ADMDocument.h"
+#include "tool/shared/output/Output.h"
+
+#include <string>
+#include <vector>
+
+class JsonWriter;
+
+/// The keys "path", one for each kind of element, and "diagnostics" unless that is null. Times are microseconds, null
+/// where they are not given. Nothing but one element is held at a time; no line break behind the object.
+void writeAdmJson(Output& output, const std::string& path, const ADMDocument& document,
+                  const std::vector<ADMDiagnostic>* diagnostics);
+
+/// An array of objects with the keys "line", "column", "name", "elementID" and "reason".
+void writeDiagnostics(JsonWriter& json, const std::vector<ADMDiagnostic>& diagnostics);

@@ -1,0 +1,52 @@
+// The lines of an ADM tree: drawn with branches for people, or plain for programs.
+#pragma once
+
+#include "tool/adm/AdmWords.h"
+#include "tool/shared/output/Output.h"
+
+#include <string>
+#include <string_view>
+#include <vector>
+
+class AdmTreeWriter {
+public:
+    struct Look {
+        bool isDrawn = true; // else a line is depth, kind, ID, name and details, separated by tabs
+        bool hasColor = false;
+        bool hasBlockIDs = false;
+        int columns = 80;       // lines are broken to fit, where they can be
+        std::string linePrefix; // ahead of every plain line
+    };
+
+    AdmTreeWriter(Output& output, Look look) : output_(output), look_(std::move(look)) {}
+
+    /// A title, written ahead of the next root, if there is one.
+    void beginSection(std::string_view title) { section_ = title; }
+    /// What is added next stands for itself.
+    void beginRoot();
+    /// What is added until `leave` stands below what was added last.
+    void enter();
+    void leave();
+    /// `isLast` of those that stand below the same one; `hasChildren` when others will stand below it.
+    void add(const AdmNode& node, bool isLast, bool hasChildren);
+
+    /// What is written goes nowhere.
+    bool isUseless() const { return output_.failed(); }
+
+private:
+    struct Piece {
+        std::string text;
+        const char* color = "";
+        const char* separator = ""; // behind it, unless a line ends there
+    };
+    void addPlain(const AdmNode& node);
+    std::vector<Piece> piecesOf(const AdmNode& node) const;
+    void draw(const std::vector<Piece>& pieces, const std::string& first, const std::string& next);
+    void drawBranch(const std::string& branch);
+
+    Output& output_;
+    Look look_;
+    std::string_view section_;
+    std::vector<bool> isLast_; // of the ones that stand above, from the root on
+    std::size_t depth_ = 0;
+};

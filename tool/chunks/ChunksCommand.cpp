@@ -1,0 +1,148 @@
+#include "tool/chunks/ChunksCommand.h"
+
+#include "tool/shared/access/FileAccess.h"
+#include "tool/shared/arguments/CommandLine.h"
+#include "tool/shared/input/InputFile.h"
+#include "tool/shared/output/Failure.h"
+#include "tool/shared/output/Table.h"
+
+#include <nlohmann/json.hpp>
+
+#include <optional>
+
+namespace {
+
+// Writes the list of one file chunk by chunk: files of hundreds of thousands of chunks are listed, not held.
+class ChunkListWriter {
+public:
+    /// With `several` files each line, or heading, says which.
+    ChunkListWriter(const OutputOptions& options, std::string path, bool several)
+        : form_(outputForm(options)),
+          color_(usesColor(options.color)),
+          several_(several),
+          path_(std::move(path))
+    {
+    }
+
+    void begin(const ContainerExtent& extent)
+    {
+        extent_ = extent;
+        begun_ = true;
+        if (form_ == Form::json) {
+            const std::string head = jsonText({{"path", path_},
+                                               {"container", fourCCText(extent.id)},
+                                               {"containerEnd", extent.end},
+                                               {"chunks", nlohmann::ordered_json::array()}});
+            output_.write(std::string_view(head).substr(0, head.size() - 2)); // up to the list's "["
+        } else if (form_ == Form::table) {
+            output_.print("{}  {}, {} bytes\n", printable(path_), fourCCText(extent.id), extent.end);
+            const int width = std::max(static_cast<int>(fmt::formatted_size("{}", extent.fileLength)), 6);
+            table_.emplace(std::vector<Table::Column>{
+                {"ID", Align::left, 4}, {"OFFSET", Align::right, width}, {"SIZE", Align::right, width}});
+            table_->printTitles(output_, color_);
+        }
+    }
+
+    bool add(const ChunkEntry& chunk)
+    {
+        const std::string id = fourCCText(chunk.id);
+        if (form_ == Form::json) // by hand, since there may be very many
+            output_.print("{}\n{{\"id\":{},\"offset\":{},\"size\":{}}}", std::exchange(first_, false) ? "" : ",",
+                          jsonText(id), chunk.offset, chunk.size);
+        else if (form_ == Form::table)
+            table_->printRow(output_, {id, std::to_string(chunk.offset), std::to_string(chunk.size)});
+        else if (form_ == Form::lines)
+            output_.print("{}{}{}\t{}\t{}\n", several_ ? printable(path_) : "", several_ ? "\t" : "", id, chunk.offset,
+                          chunk.size);
+        return !output_.failed();
+    }
+
+    /// `error` is empty when all went well.
+    void end(const std::string& error)
+    {
+        if (form_ == Form::json && !begun_)
+            output_.write(jsonText({{"path", path_}, {"error", error}}));
+        else if (form_ == Form::json)
+            output_.print("{}]{}}}", first_ ? "" : "\n", error.empty() ? "" : ",\"error\":" + jsonText(error));
+        else if (form_ == Form::table && begun_ && extent_.end < extent_.fileLength)
+            output_.print("{} bytes follow the container\n", extent_.fileLength - extent_.end);
+    }
+
+private:
+    Form form_;
+    bool color_;
+    bool several_;
+    std::string path_;
+    bool begun_ = false;
+    bool first_ = true;
+    ContainerExtent extent_;
+    std::optional<Table> table_;
+    Output& output_ = Output::standard();
+};
+
+void listFile(const std::string& path, ChunkListWriter& writer, bool quiet)
+{
+    const FileAccess access = accessForReading(path, {.quiet = quiet});
+    CAudioFileIO file;
+    openContainer(file, path, 0);
+    ContainerExtent extent;
+    bool begun = false;
+    const std::int32_t status = file.ForEachChunk(
+        [&](const ChunkEntry& chunk) {
+            if (!std::exchange(begun, true))
+                writer.begin(extent);
+            return writer.add(chunk);
+        },
+        &extent);
+    if (status != kStatusOK)
+        throw Failure(begun ? "a chunk header cannot be read" : "its container header cannot be read");
+    if (!begun)
+        writer.begin(extent);
+}
+
+bool runList(const std::vector<std::string>& files, const OutputOptions& options)
+{
+    Output& output = Output::standard();
+    const bool several = files.size() > 1;
+    const bool array = several && options.json;
+    const bool table = outputForm(options) == Form::table;
+    bool good = true;
+    for (const std::string& path : files) {
+        const bool first = &path == &files.front();
+        output.write(array ? (first ? "[\n" : ",\n") : table && !first ? "\n" : "");
+        ChunkListWriter writer(options, path, several);
+        std::string error;
+        if (!reportingFailures(path, [&] {
+                try {
+                    listFile(path, writer, options.quiet);
+                } catch (const Failure& failure) {
+                    error = failure.what();
+                    throw;
+                }
+            }))
+            good = false;
+        writer.end(error);
+        if (output.failed())
+            break;
+    }
+    output.write(array ? "\n]\n" : options.json ? "\n" : "");
+    return good;
+}
+
+void declareChunks(CommandLine& commandLine)
+{
+    static std::vector<std::string> files;
+    CLI::App& verb =
+        commandLine.addVerb("chunks", "List the chunks of audio files; get, add or remove one", [&commandLine] {
+            if (files.empty())
+                throw CLI::RequiredError("FILE");
+            return runList(files, commandLine.output());
+        });
+    CommandLine::addFiles(verb, files);
+    declareChunksGet(commandLine, verb);
+    declareChunkEdits(commandLine, verb);
+}
+
+const VerbRegistration registration{20, declareChunks};
+
+} // namespace

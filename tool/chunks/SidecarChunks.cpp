@@ -1,0 +1,299 @@
+#include "tool/chunks/SidecarChunks.h"
+
+#include "audiofile/BusFormats.h"
+#include "tool/chunks/ContainerChanges.h"
+#include "tool/shared/arguments/CommandLine.h"
+#include "tool/shared/edits/FileCopy.h"
+#include "tool/shared/edits/TemporaryFile.h"
+#include "tool/shared/input/InputFile.h"
+#include "tool/shared/output/Failure.h"
+
+#include <algorithm>
+#include <cerrno>
+#include <fcntl.h>
+#include <filesystem>
+#include <fstream>
+#include <sys/stat.h>
+#include <unistd.h>
+
+namespace {
+
+constexpr char kMetadataExtension[] = "ktmd";
+
+std::string resolved(const std::string& path)
+{
+    requireRegularFile(path);
+    std::error_code error;
+    const std::filesystem::path canonical = std::filesystem::canonical(path, error);
+    if (error)
+        throw Failure(systemErrorText(error.value()));
+    return canonical.string();
+}
+
+bool isRegularFile(const std::string& path)
+{
+    struct stat status = {};
+    return !path.empty() && ::stat(path.c_str(), &status) == 0 && S_ISREG(status.st_mode);
+}
+
+bool isSameFile(const std::string& a, const std::string& b)
+{
+    std::error_code error; // of those that are not both there
+    return a == b || std::filesystem::equivalent(a, b, error);
+}
+
+std::string beside(const std::string& path, const std::string& extension)
+{
+    CFileRef sidecar = referenceTo(path);
+    sidecar.ReplaceExtensionBy(extension);
+    return std::string(sidecar);
+}
+
+struct SidecarNames {
+    std::string metadata, raw; // empty: none
+
+    SidecarNames(const std::string& file, const std::string& extension)
+        : metadata(beside(file, kMetadataExtension)),
+          raw(beside(file, extension))
+    {
+        if (isSameFile(raw, file) || isSameFile(raw, metadata))
+            raw.clear();
+        if (isSameFile(metadata, file))
+            metadata.clear();
+    }
+};
+
+/// None when it is not there; throws Failure when it cannot be read.
+std::optional<Bytes> chunkIn(const std::string& container, FourCC id)
+{
+    CAudioFileIO file;
+    openContainer(file, container, 0);
+    CChunkData chunk;
+    const std::int32_t found = file.FindChunk(id, chunk);
+    if (found == 0)
+        return std::nullopt;
+    if (found != 1)
+        throw Failure(container + ": its chunk \"" + fourCCText(id) + "\" cannot be read");
+    const BytesView body = chunk.bytes();
+    return Bytes(body.begin(), body.end());
+}
+
+Bytes contentOf(const std::string& path)
+{
+    CFileIO file;
+    requireOK(file.OpenRead(referenceTo(path), 0));
+    Bytes content(static_cast<std::size_t>(file.GetEOF()));
+    requireOK(file.Read(content.data(), static_cast<long>(content.size())));
+    return content;
+}
+
+std::int64_t sizeOf(const std::string& path)
+{
+    struct stat status = {};
+    if (::stat(path.c_str(), &status) != 0)
+        throw Failure(systemErrorText(errno));
+    return status.st_size;
+}
+
+/// What an interrupted creation leaves: less than a container, and what is there is the start of one.
+bool isTorn(const std::string& path)
+{
+    constexpr std::int64_t kLeast = 20;
+    constexpr std::string_view kStart = "FORM";
+    if (sizeOf(path) >= kLeast)
+        return false;
+    const Bytes content = contentOf(path);
+    return textOf(content).substr(0, kStart.size()) == kStart.substr(0, content.size());
+}
+
+/// Whatever the file holds, it is an AIFF file without sound then, with the one chunk.
+void makeMetadata(const std::string& path, FourCC id, const Bytes& body)
+{
+    CAudioFileIO file;
+    requireOK(file.CreateAndOpenCommon(referenceTo(path), 0, kAudioBusMono, 0, 16, 44100, kAIFF, true));
+    requireOK(file.Close());
+    addChunkTo(path, {id, body, false, false});
+}
+
+[[noreturn]] void failToChange(const std::string& sidecar, const Failure& failure)
+{
+    throw Failure(sidecar + ": " + failure.what());
+}
+
+} // namespace
+
+void addSidecarOption(CLI::App& verb, std::string& extension)
+{
+    verb.add_option("--sidecar", extension, "Any kind of file: chunks of what is no container lie beside it")
+        ->option_text("EXT")
+        ->check(CLI::Validator(
+            [](std::string& text) {
+                return text.empty() || text.find('/') != text.npos ? "\"" + text + "\" is no extension" : std::string();
+            },
+            ""));
+}
+
+bool keepsItsChunks(const std::string& path)
+{
+    CAudioFileIO file;
+    requireOK(file.Open(referenceTo(path), 0));
+    return file.Info().fileType == kCaff || file.IsChunkBased() != 0;
+}
+
+SidecarChunk readFromAnywhere(const std::string& path, FourCC id, const std::string& extension)
+{
+    const std::string file = resolved(path);
+    const SidecarNames names(file, extension);
+    if (isRegularFile(names.metadata) && !isTorn(names.metadata)) {
+        if (!keepsItsChunks(names.metadata))
+            return {contentOf(names.metadata), names.metadata};
+        if (auto body = chunkIn(names.metadata, id))
+            return {std::move(*body), names.metadata};
+    }
+    if (isRegularFile(names.raw) && keepsItsChunks(names.raw))
+        if (auto body = chunkIn(names.raw, id))
+            return {std::move(*body), names.raw};
+    if (keepsItsChunks(file))
+        if (auto body = chunkIn(file, id))
+            return {std::move(*body), path};
+    throw Failure("has no chunk \"" + fourCCText(id) + "\", and neither have its sidecars");
+}
+
+Sidecars::Sidecars(const std::string& path, const std::string& extension, const EditOptions& options)
+    : file_(resolved(path)),
+      options_(options)
+{
+    const SidecarNames names(file_, extension);
+    metadata_ = names.metadata;
+    raw_ = names.raw;
+    options_.inPlace = options_.backup = false; // they are small
+}
+
+std::optional<std::string> Sidecars::objection() const
+{
+    if (!isRegularFile(raw_))
+        return std::nullopt;
+    CAudioFileIO file;
+    requireOK(file.Open(referenceTo(raw_), 0));
+    if (file.Info().fileType == 0 && file.IsChunkBased() == 0)
+        return std::nullopt;
+    return raw_ + " is an audio file of its own, and would be lost as an older copy of the chunk";
+}
+
+std::string Sidecars::add(FourCC id, const Bytes& body, bool force)
+{
+    if (metadata_.empty())
+        throw Failure("is no container, and has the name that its metadata sidecar would have");
+    try {
+        addToMetadata(id, body, force);
+    } catch (const Failure& failure) {
+        failToChange(metadata_, failure);
+    }
+    rewriteRaw(body);
+    return metadata_;
+}
+
+void Sidecars::addToMetadata(FourCC id, const Bytes& body, bool force)
+{
+    // Whoever else makes it meanwhile is found the next time.
+    while (!isRegularFile(metadata_))
+        if (options_.dryRun || createMetadata(id, body))
+            return;
+    SafeEdit edit(metadata_, options_);
+    std::optional<std::string> objection;
+    const bool torn = isTorn(edit.target());
+    const bool isWhole = !torn && keepsItsChunks(edit.target());
+    if (isWhole) {
+        CAudioFileIO file;
+        openContainer(file, edit.target(), 0);
+        objection = objectionToAdding(file, surveyChunks(file, id), id);
+    } else if (!torn) {
+        objection = "is no metadata sidecar, and would be lost";
+    }
+    if (objection && !force)
+        throw Failure(*objection + "; --force does it all the same");
+    if (options_.dryRun)
+        return;
+    if (isWhole)
+        edit.apply(objection ? EditScope::wholeFile() : EditScope::chunk(id), [&](const std::string& path) {
+            addChunkTo(path, {id, body, true, force});
+        });
+    else
+        edit.apply(EditScope::wholeFile(), [&](const std::string& path) { makeMetadata(path, id, body); });
+}
+
+/// False when somebody else was faster.
+bool Sidecars::createMetadata(FourCC id, const Bytes& body)
+{
+    const FileAccess access =
+        accessForWriting(metadata_, platform::FileCoordinator::WritingOptions::none, options_.waiting());
+    struct stat sound = {};
+    if (::stat(file_.c_str(), &sound) != 0)
+        throw Failure(systemErrorText(errno));
+    TemporaryFile made(metadata_);
+    makeMetadata(made.path(), id, body);
+    // Whoever may read the one may read the other; the owner where that can be had.
+    if (::fchown(made.descriptor(), sound.st_uid, sound.st_gid) != 0 && errno != EPERM)
+        throw Failure(systemErrorText(errno));
+    if (::fchmod(made.descriptor(), sound.st_mode & 0666) != 0)
+        throw Failure(systemErrorText(errno));
+    synchronize(made.descriptor());
+    if (!made.publish(metadata_))
+        return false;
+    if (!made.synchronizeFolder())
+        throw Failure("is edited, but a loss of power now may undo that: its folder cannot be committed to storage: " +
+                      systemErrorText(errno));
+    return true;
+}
+
+void Sidecars::rewriteRaw(const Bytes& body)
+{
+    if (!isRegularFile(raw_))
+        return;
+    try {
+        SafeEdit edit(raw_, options_);
+        if (!options_.dryRun)
+            edit.apply(EditScope::wholeFile(), [&](const std::string& path) {
+                CFileIO file;
+                requireOK(file.Open(referenceTo(path), kFileIOReadWrite));
+                requireOK(file.SetEOF(0));
+                requireOK(file.Write(body.data(), 0, static_cast<long>(body.size())));
+                requireOK(file.Close());
+            });
+    } catch (const Failure& failure) {
+        failToChange(raw_, failure);
+    }
+}
+
+void Sidecars::removeRaw()
+{
+    if (!isRegularFile(raw_) || options_.dryRun)
+        return;
+    const FileAccess access =
+        accessForWriting(raw_, platform::FileCoordinator::WritingOptions::none, options_.waiting());
+    if (::unlink(raw_.c_str()) != 0 && errno != ENOENT)
+        throw Failure(raw_ + ": " + systemErrorText(errno));
+    synchronizeFolderOf(raw_.c_str());
+}
+
+SidecarRemoval Sidecars::remove(FourCC id)
+{
+    SidecarRemoval removal;
+    if (isRegularFile(metadata_)) {
+        SafeEdit edit(metadata_, options_);
+        if (!isTorn(edit.target()) && keepsItsChunks(edit.target()))
+            removal.count = surveyOf(edit.target(), id).count;
+        if (removal.count > 0) {
+            removal.where = metadata_;
+            if (!options_.dryRun)
+                edit.apply(EditScope::chunk(id),
+                           [&](const std::string& path) { removeChunksFrom(path, id, removal.count); });
+        }
+    }
+    if (isRegularFile(raw_)) {
+        ++removal.count;
+        removal.where = raw_;
+        removeRaw();
+    }
+    return removal;
+}

@@ -1,0 +1,129 @@
+// ktfiles decode: audio files of any format to linear PCM.
+#include "tool/decode/DecodeReport.h"
+#include "tool/decode/DecodeTargets.h"
+#include "tool/shared/arguments/CommandLine.h"
+#include "tool/shared/arguments/SoundRange.h"
+#include "tool/shared/input/FileByFile.h"
+
+#include <array>
+#include <unistd.h>
+
+namespace {
+
+constexpr std::pair kRates{1, 768'000};
+constexpr std::pair kChannels{1, 1024};
+
+struct NamedDepth {
+    std::string_view name;
+    SampleDepth depth;
+};
+constexpr std::array<NamedDepth, 4> kDepths{
+    {{"16", {16, false}}, {"24", {24, false}}, {"32", {32, false}}, {"f32", {32, true}}}};
+
+struct DecodeArguments {
+    std::vector<std::string> files;
+    std::string out;
+    DecodeOptions options;
+};
+
+const NamedDepth* depthNamed(std::string_view name)
+{
+    const auto found =
+        std::find_if(kDepths.begin(), kDepths.end(), [name](const NamedDepth& depth) { return depth.name == name; });
+    return found != kDepths.end() ? &*found : nullptr;
+}
+
+// The format that is asked for, or that the name of the output means.
+const DecodeFormat& formatFor(const DecodeArguments& arguments)
+{
+    if (arguments.options.wishes.format != nullptr)
+        return *arguments.options.wishes.format;
+    const bool namesFile = arguments.out != "-" && !isDecodeFolder(arguments.out);
+    const DecodeFormat* const format = namesFile ? decodeFormatOf(arguments.out) : decodeFormats().data();
+    if (format == nullptr)
+        throw CLI::ValidationError("the extension of \"" + printable(arguments.out) +
+                                   "\" is that of no format here: --format says which is meant");
+    return *format;
+}
+
+bool runDecode(DecodeArguments& arguments, OutputOptions output)
+{
+    arguments.options.wishes.format = &formatFor(arguments);
+    arguments.options.quiet = output.quiet;
+    requireOrder(arguments.options.wishes.start, arguments.options.wishes.end);
+    const std::vector<DecodeJob> jobs = decodeJobs(arguments.files, arguments.out, *arguments.options.wishes.format);
+    const bool toOutput = arguments.out == "-";
+    if (toOutput && output.json)
+        throw CLI::ValidationError("--json and the sound cannot both go to standard output");
+    if (toOutput && isTerminal(STDOUT_FILENO))
+        throw CLI::ValidationError("sound does not go to a terminal: name a file");
+    std::optional<DecodeFolder> folder;
+    if (!reportingFailures(arguments.out, [&] { folder.emplace(arguments.out); }))
+        return false;
+    DecodeReport report(toOutput ? Form::none : outputForm(output));
+    auto job = jobs.begin();
+    return writeFileByFile(report, arguments.files,
+                           [&](const std::string&) { return decodeFile(*job++, arguments.options); });
+}
+
+template <class Value>
+void addNumber(CLI::App& verb, const std::string& name, std::optional<Value>& value, std::pair<int, int> range,
+               const std::string& description)
+{
+    verb.add_option_function<int>(
+            name, [&value](int number) { value = static_cast<Value>(number); },
+            fmt::format("{}, {} to {}", description, range.first, range.second))
+        ->option_text("N")
+        ->check(CLI::Range(range.first, range.second).description(""));
+}
+
+// An option whose text means something, or is a mistake.
+template <class Parse, class Take>
+void addText(CLI::App& verb, const std::string& name, const std::string& label, Parse parse, Take take,
+             const std::string& problem, const std::string& description)
+{
+    verb.add_option_function<std::string>(
+            name, [parse, take](const std::string& text) { take(parse(text)); }, description)
+        ->option_text(label)
+        ->check(CLI::Validator(
+            [parse, problem](std::string& text) {
+                return parse(text) ? "" : "\"" + printable(text) + "\" is " + problem;
+            },
+            ""));
+}
+
+void addSoundOptions(CLI::App& verb, DecodeWishes& wishes)
+{
+    addText(
+        verb, "--format", "FORMAT", decodeFormatNamed,
+        [&wishes](const DecodeFormat* format) { wishes.format = format; }, "none of wav, aiff, caf, raw",
+        "wav, aiff, caf or raw (bare samples); else what the extension of OUT means, or wav");
+    addNumber(verb, "--rate", wishes.sampleRate, kRates, "Convert to a sample rate in Hz");
+    addNumber(verb, "--channels", wishes.channels, kChannels, "Convert to a number of channels");
+    addText(
+        verb, "--bits", "BITS", depthNamed, [&wishes](const NamedDepth* depth) { wishes.depth = depth->depth; },
+        "none of 16, 24, 32, f32",
+        "16, 24, 32 or f32 (floats; in AIFF as AIFC); else as in FILE, floats of lossy formats");
+    addSoundRange(verb, {.start = [&wishes](const SoundLength& start) { wishes.start = start; },
+                         .end = [&wishes](const SoundLength& end) { wishes.end = end; },
+                         .frames = [&wishes](const SoundLength& frames) { wishes.frames = frames; }});
+}
+
+void declareDecode(CommandLine& commandLine)
+{
+    static DecodeArguments arguments;
+    CLI::App& verb = commandLine.addVerb("decode", "Decode audio files of any format to linear PCM",
+                                         [&commandLine] { return runDecode(arguments, commandLine.output()); });
+    CommandLine::addFiles(verb, arguments.files)->required();
+    CommandLine::addPath(verb, "-o,--output", arguments.out,
+                         "The file or folder to write to, \"-\" for standard output; else the current folder")
+        ->option_text("OUT");
+    addSoundOptions(verb, arguments.options.wishes);
+    verb.add_flag("--conceal", arguments.options.conceal,
+                  "Keep what a damaged file gives, with silence for the frames that cannot be decoded");
+    verb.add_flag("--force", arguments.options.force, "Replace files that exist");
+}
+
+const VerbRegistration registration{90, declareDecode};
+
+} // namespace

@@ -1,0 +1,160 @@
+#include "tool/decode/DecodeFile.h"
+
+#include "tool/shared/access/FileAccess.h"
+#include "tool/shared/edits/OutputFile.h"
+#include "tool/shared/output/Failure.h"
+#include "tool/shared/output/Output.h"
+#include "tool/shared/output/Progress.h"
+#include "tool/shared/output/UnseenCharacters.h"
+
+#include <fmt/format.h>
+
+#include <cstdio>
+#include <memory>
+
+namespace {
+
+/// A file, or standard output; which has nothing behind it once it failed.
+class Target {
+public:
+    Target(const DecodeJob& job, bool force)
+    {
+        if (job.output != "-")
+            file_ = std::make_unique<OutputFile>(job.output, job.file,
+                                                 force ? OutputFile::Existing::replace : OutputFile::Existing::refuse);
+    }
+
+    bool failed() const { return !file_ && Output::standard().failed(); }
+    void write(std::string_view bytes)
+    {
+        if (file_) {
+            file_->write(bytes);
+        } else {
+            Output::standard().write(bytes);
+            Output::standard().flush();
+        }
+    }
+    /// Null for one that cannot be gone back to.
+    OutputFile* regular() const { return file_ && file_->isRegular() ? file_.get() : nullptr; }
+    void finish(bool quiet)
+    {
+        if (!file_)
+            return;
+        const FileAccess access = accessToReplaced(quiet);
+        file_->finish();
+    }
+
+private:
+    FileAccess accessToReplaced(bool quiet) const
+    {
+        const std::string& path = file_->replaced();
+        try {
+            return path.empty() ? nullptr
+                                : accessForWriting(path, platform::FileCoordinator::WritingOptions::forReplacing,
+                                                   {.quiet = quiet});
+        } catch (const Failure& failure) {
+            throw Failure(path + " " + failure.what());
+        }
+    }
+
+    std::unique_ptr<OutputFile> file_;
+};
+
+/// The header, and then the samples; returns the frames that came. The first samples go out with the header: who reads
+/// from a pipe looks at what the first read gives.
+std::int64_t copySound(std::string header, DecodeSource& source, Target& target, bool quiet)
+{
+    Progress progress("decoding", source.sound().frames, quiet);
+    const std::int64_t bytesPerFrame = source.sound().bytesPerFrame();
+    std::int64_t done = 0;
+    for (std::string_view samples = source.read(); !samples.empty() && !target.failed(); samples = source.read()) {
+        target.write(header.empty() ? samples : std::string_view(header.append(samples)));
+        header.clear();
+        const std::int64_t frames = std::ssize(samples) / bytesPerFrame;
+        done += frames;
+        progress.advance(frames);
+    }
+    target.write(header); // of no samples
+    return done;
+}
+
+// A damaged file may end ahead of what it promises.
+void setFrames(const DecodeFrame& frame, std::int64_t frames, const DecodeResult& result, Target& target)
+{
+    const std::string header = frame.header(frames);
+    if (header.empty())
+        return;
+    if (target.regular() == nullptr)
+        throw Failure(fmt::format("ends after {} of {} frames, and the header says more", frames, result.sound.frames));
+    target.regular()->rewrite(0, header);
+}
+
+void writeSound(DecodeSource& source, const DecodeFrame& frame, Target& target, bool quiet, DecodeResult& result)
+{
+    const std::int64_t frames = copySound(frame.header(source.sound().frames), source, target, quiet);
+    if (frames != result.sound.frames && !target.failed())
+        setFrames(frame, frames, result, target);
+    target.write(frame.trailer(frames));
+    result.sound.frames = frames;
+    result.clippedSamples = source.clippedSamples();
+}
+
+/// What of the sound is not as it was made; empty where nothing is known to be.
+std::string damageTo(const DecodeSource& source)
+{
+    if (const std::uint64_t missing = source.missingFrames(); missing > 0)
+        return fmt::format("{} cannot be decoded", missing == 1 ? "1 frame" : fmt::format("{} frames", missing));
+    return source.isOtherThanItsChecksum() ? "the sound is not what its checksum says" : "";
+}
+
+void tell(const std::string& path, const std::string& note)
+{
+    reportFailure(path, note);
+}
+
+void tellAll(const std::string& path, const DecodeSource& source, const DecodeResult& result)
+{
+    for (const std::string& note : source.notes())
+        tell(path, note);
+    if (result.sound.frames < source.sound().frames)
+        tell(path, fmt::format("ends after {} of {} frames", result.sound.frames, source.sound().frames));
+    if (const std::string damage = damageTo(source); !damage.empty())
+        tell(path, damage + (result.missingFrames > 0 ? "; they are silent" : ""));
+    if (result.clippedSamples > 0)
+        tell(path, fmt::format("{} clipped; --bits f32 keeps what is beyond full scale",
+                               result.clippedSamples == 1 ? "1 sample is"
+                                                          : fmt::format("{} samples are", result.clippedSamples)));
+    for (const std::string& note : result.tags.notKept)
+        tell(path, note);
+}
+
+} // namespace
+
+DecodeResult decodeFile(const DecodeJob& job, const DecodeOptions& options)
+{
+    FileAccess access = accessForReading(job.file, {.quiet = options.quiet});
+    DecodeSource source(job.file, options.wishes);
+    DecodeTags tags(job.file);
+    const DecodeFrame frame(source.sound(), *options.wishes.format);
+    DecodeResult result{.output = job.output,
+                        .container = frame.container(),
+                        .sound = source.sound(),
+                        .clippedSamples = 0,
+                        .missingFrames = 0,
+                        .tags = {}};
+    Target target(job, options.force);
+    writeSound(source, frame, target, options.quiet, result);
+    access.reset(); // ahead of the wait for others who have the output
+    if (target.failed())
+        return result;
+    result.missingFrames = source.missingFrames();
+    if (const std::string damage = damageTo(source); !damage.empty() && !options.conceal)
+        throw Failure(damage + "; --conceal takes it as it is");
+    result.tags =
+        tags.carryTo(target.regular() != nullptr ? target.regular()->path() : "", result.container, result.sound,
+                     source.sourceRate(), source.isWhole() && result.sound.frames == source.sound().frames);
+    target.finish(options.quiet);
+    if (!options.quiet)
+        tellAll(job.file, source, result);
+    return result;
+}

@@ -1,0 +1,24 @@
+// What `ktfiles decode` prints of each file that it wrote.
+#pragma once
+
+#include "tool/decode/DecodeFile.h"
+#include "tool/shared/output/Output.h"
+
+#include <string>
+
+/// A writer for writeFileByFile.
+class DecodeReport {
+public:
+    explicit DecodeReport(Form form) : form_(form) {}
+
+    void add(const std::string& path, const DecodeResult& result);
+    void addFailure(const std::string& path, const std::string& text);
+    void finish();
+
+private:
+    void addJson(const std::string& json);
+
+    Form form_;
+    bool first_ = true;
+    Output& output_ = Output::standard();
+};

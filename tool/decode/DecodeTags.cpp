@@ -1,0 +1,155 @@
+#include "tool/decode/DecodeTags.h"
+
+#include "audiofile/CAudioFileIO.h"
+#include "audiofile/ContainerHeaders.h"
+#include "loops/tagging/CAFPayloads.h"
+#include "loops/tagging/ChunkIDs.h"
+#include "tool/shared/input/InputFile.h"
+#include "tool/shared/looptags/LoopTagFields.h"
+
+#include <fmt/format.h>
+
+#include <algorithm>
+#include <cmath>
+
+namespace {
+
+// What the sound is made of, room, and what can be made from the sound again.
+constexpr FourCC kOfTheSound[] = {
+    fourCC("fmt "), fourCC("fact"), fourCC("data"), fourCC("ds64"), fourCC("COMM"), fourCC("FVER"), fourCC("SSND"),
+    fourCC("desc"), fourCC("pakt"), fourCC("kuki"), fourCC("chan"), fourCC("free"), fourCC("JUNK"), fourCC("junk"),
+    fourCC("PAD "), fourCC("FLLR"), fourCC("PEAK"), fourCC("peak"), fourCC("LGWV"), fourCC("ovvw"), fourCC("ovwf")};
+// Loop tags, in files that can hold some. "uuid" and "info" of CAF are looked into.
+constexpr FourCC kOfTags[] = {tagging::kBasicTagging,  tagging::kCategories,
+                              tagging::kTransients,    tagging::kChannelStrip0,
+                              tagging::kChannelStrip1, tagging::kChannelStrip2,
+                              tagging::kPatch,         tagging::kGenerativeInstrument,
+                              tagging::kEventSequence, tagging::kAdditionalLoopData,
+                              tagging::kStepSequencer, tagging::kMIDIFile,
+                              tagging::kCAFMIDIChunk,  tagging::kCAFUUIDChunk,
+                              fourCC("info"),          fourCC("NAME"),
+                              fourCC("AUTH"),          fourCC("(c) "),
+                              fourCC("COMT")};
+
+std::string nameOf(FourCC id)
+{
+    const std::string text = fourCCText(id);
+    return text.substr(0, text.find_last_not_of(' ') + 1);
+}
+
+bool hasOtherTexts(const RawLoopTags& tags)
+{
+    bool hasOthers = false;
+    if (const auto info = tags.texts.find(fourCC("info")); tags.fileType == kCaff && info != tags.texts.end())
+        tagging::ForEachCAFInfoString(info->second, [&](std::string_view key, std::string_view) {
+            hasOthers = hasOthers || std::ranges::none_of(tagFields(), [&](const TagField& field) {
+                            return field.isFileInfo && field.name == key;
+                        });
+        });
+    return hasOthers;
+}
+
+bool hasOtherUUIDs(const std::string& path)
+{
+    VireoLoopChunksManager manager = openLoopFile(path, platform::AudioFile::Permission::read);
+    std::uint32_t count = 0;
+    if (manager.audioFileTypeID() != kCaff ||
+        manager.audioFile()->countUserData(tagging::kCAFUUIDChunk, count) != kStatusOK)
+        return false;
+    for (std::uint32_t index = 0; index < count; ++index) {
+        tagging::UUIDBytes uuid{};
+        std::uint32_t size = sizeof uuid;
+        if (manager.audioFile()->userData(tagging::kCAFUUIDChunk, index, size, uuid) == kStatusOK &&
+            cafChunkUUIDToChunkID(&uuid) == 0 && !UUIDIsEqual(uuid, tagging::kSilenceUUID))
+            return true;
+    }
+    return false;
+}
+
+// Each once, in the order of the file.
+std::vector<std::string> otherChunks(const std::string& path, bool holdsTags)
+{
+    std::vector<std::string> others;
+    CAudioFileIO file;
+    if (file.Open(referenceTo(path), 0) != kStatusOK)
+        return others;
+    file.ForEachChunk([&](const ChunkEntry& chunk) {
+        const bool isTold = std::ranges::find(kOfTheSound, chunk.id) != std::end(kOfTheSound) ||
+                            (holdsTags && std::ranges::find(kOfTags, chunk.id) != std::end(kOfTags)) ||
+                            std::ranges::find(others, nameOf(chunk.id)) != others.end();
+        if (!isTold)
+            others.push_back(nameOf(chunk.id));
+        return others.size() < 1000;
+    });
+    return others;
+}
+
+std::string inWords(const std::vector<std::string>& chunks)
+{
+    constexpr std::size_t most = 12;
+    std::string text = fmt::format(
+        "{}", fmt::join(chunks.begin(), chunks.begin() + std::min(std::ssize(chunks), std::ptrdiff_t{most}), ", "));
+    if (chunks.size() > most)
+        text += fmt::format(" and {} other chunks", chunks.size() - most);
+    return fmt::format("{} {} not carried over", text, chunks.size() == 1 ? "is" : "are");
+}
+
+} // namespace
+
+DecodeTags::DecodeTags(const std::string& path)
+{
+    bool holdsTags = true;
+    try {
+        source_ = readLoopSource(path);
+    } catch (const NoLoopContainer&) {
+        holdsTags = false;
+    } catch (const Failure& failure) { // no reason to go without the sound
+        problem_ = failure.what();
+    }
+    others_ = otherChunks(path, holdsTags);
+    if (source_ && hasOtherUUIDs(path))
+        others_.emplace_back("uuid");
+    if (source_ && hasOtherTexts(source_->bytes))
+        others_.emplace_back("the rest of info");
+    if (source_ && source_->isEmpty())
+        source_.reset();
+}
+
+CarriedTags DecodeTags::carryTo(const std::string& output, const std::string& container, const DecodedSound& sound,
+                                double sourceRate, bool isWhole)
+{
+    CarriedTags carried;
+    const bool canHold = container == "AIFF" || container == "CAF";
+    const std::string obstacle = !problem_.empty()    ? "they " + problem_
+                                 : source_ == nullptr ? ""
+                                 : !canHold ? fmt::format("{} holds none", container == "raw" ? "raw sound" : container)
+                                 : output.empty() ? "they are put into files only"
+                                 : !isWhole       ? "they are true of the whole file only"
+                                                  : "";
+    if (!obstacle.empty())
+        carried.notKept.push_back("its tags are not carried over: " + obstacle);
+    if (!others_.empty())
+        carried.notKept.push_back(inWords(others_));
+    if (!obstacle.empty() || source_ == nullptr)
+        return carried;
+    if (sound.sampleRate != sourceRate && sourceRate > 0)
+        scaleTransients(sound.sampleRate / sourceRate);
+    try {
+        const TagsPlan plan = planTagsCopy(source_, readLoopTags(output), output);
+        if (!plan.changes.empty())
+            writeTags(output, plan);
+        for (const TagChange& change : plan.changes)
+            carried.keys.push_back(change.key);
+        carried.notKept.insert(carried.notKept.end(), plan.notKept.begin(), plan.notKept.end());
+    } catch (const Failure& failure) { // nor a reason to lose it
+        carried.notKept.push_back(std::string("its tags are not carried over: ") + failure.what());
+    }
+    return carried;
+}
+
+void DecodeTags::scaleTransients(double factor)
+{
+    for (VireoLoopTransient& transient : source_->tags.transients)
+        transient.setFrame(
+            static_cast<std::uint64_t>(std::min(std::round(static_cast<double>(transient.frame()) * factor), 9e18)));
+}

@@ -1,0 +1,137 @@
+// ktfiles locks: who presents, holds and waits for files.
+#include "tool/lock/ItemNames.h"
+#include "tool/shared/access/FileAccess.h"
+#include "tool/shared/access/Parties.h"
+#include "tool/shared/arguments/CommandLine.h"
+#include "tool/shared/output/Failure.h"
+#include "tool/shared/output/Table.h"
+
+#include <nlohmann/json.hpp>
+
+namespace {
+
+using platform::CoordinationParty;
+
+const char* roleText(CoordinationParty::Role role)
+{
+    switch (role) {
+    case CoordinationParty::Role::presents:
+        return "presents";
+    case CoordinationParty::Role::holds:
+        return "holds";
+    default:
+        return "waits";
+    }
+}
+
+class PartiesWriter {
+public:
+    explicit PartiesWriter(const OutputOptions& options) : form_(outputForm(options)), color_(usesColor(options.color))
+    {
+    }
+
+    /// `path` is empty when only the item's number is known.
+    void add(const std::string& path, const CoordinationParty& party)
+    {
+        const std::string name = processName(party.processID);
+        const char* const role = roleText(party.role);
+        const char* const access = party.isWriting ? "write" : "read";
+        const std::string item = path.empty() ? fmt::format("item:{:012x}", party.itemNumber) : printable(path);
+        if (form_ == Form::json)
+            addJson({{"path", path.empty() ? nlohmann::ordered_json() : nlohmann::ordered_json(path)},
+                     {"item", party.itemNumber},
+                     {"role", role},
+                     {"access", access},
+                     {"processID", party.processID},
+                     {"command", name}});
+        else if (form_ == Form::table)
+            table_.add({item, role, access, std::to_string(party.processID), printable(name)});
+        else if (form_ == Form::lines)
+            output_.print("{}\t{}\t{}\t{}\t{}\n", item, role, access, party.processID, printable(name));
+    }
+
+    void addFailure(const std::string& path, const std::string& text)
+    {
+        if (form_ == Form::json)
+            addJson({{"path", path}, {"error", text}});
+    }
+
+    void finish()
+    {
+        if (form_ == Form::json)
+            output_.print("{}]\n", first_ ? "[" : "\n");
+        table_.print(output_, color_);
+    }
+
+private:
+    void addJson(const nlohmann::ordered_json& object)
+    {
+        output_.print("{}{}", std::exchange(first_, false) ? "[\n" : ",\n", jsonText(object));
+    }
+
+    Form form_;
+    bool color_;
+    bool first_ = true;
+    Output& output_ = Output::standard();
+    Table table_{{{"FILE"}, {"ROLE"}, {"ACCESS"}, {"PROCESS", Align::right}, {"COMMAND"}}};
+};
+
+std::vector<CoordinationParty> allParties()
+{
+    platform::Error error;
+    auto parties = platform::coordinationParties(&error);
+    if (!error.description.empty())
+        throw Failure(error.description);
+    return parties;
+}
+
+bool listFiles(const std::vector<std::string>& files, PartiesWriter& writer)
+{
+    const auto parties = allParties();
+    bool good = true;
+    for (const std::string& path : files) {
+        try {
+            const auto number = platform::coordinationItemNumber(coordinatedURL(path));
+            for (const CoordinationParty& party : parties)
+                if (party.itemNumber == number)
+                    writer.add(path, party);
+        } catch (const Failure& failure) {
+            good = false;
+            writer.addFailure(path, failure.what());
+            reportFailure(path, failure.what());
+        }
+    }
+    return good;
+}
+
+bool runLocks(const std::vector<std::string>& files, const OutputOptions& options)
+{
+    PartiesWriter writer(options);
+    bool good = true;
+    const bool listed = reportingFailures("locks", [&] {
+        if (!files.empty()) {
+            good = listFiles(files, writer);
+            return;
+        }
+        const auto parties = allParties();
+        const auto names = itemNames(parties);
+        for (const CoordinationParty& party : parties) {
+            const auto name = names.find(party.itemNumber);
+            writer.add(name == names.end() ? std::string() : name->second, party);
+        }
+    });
+    writer.finish();
+    return listed && good;
+}
+
+void declareLocks(CommandLine& commandLine)
+{
+    static std::vector<std::string> files;
+    CLI::App& verb = commandLine.addVerb("locks", "List who presents, holds and waits for files, by process",
+                                         [&commandLine] { return runLocks(files, commandLine.output()); });
+    CommandLine::addFiles(verb, files)->description("The files; else all");
+}
+
+const VerbRegistration registration{80, declareLocks};
+
+} // namespace

@@ -1,0 +1,205 @@
+// ktfiles overview: waveforms as sparklines, numbers and pictures, and stored in the files.
+#include "tool/overview/OverviewReport.h"
+#include "tool/overview/OverviewStore.h"
+#include "tool/overview/PNGPicture.h"
+#include "tool/overview/SVGPicture.h"
+#include "tool/shared/access/FileAccess.h"
+#include "tool/shared/arguments/CommandLine.h"
+#include "tool/shared/arguments/SoundRange.h"
+#include "tool/shared/edits/OutputFile.h"
+#include "tool/shared/output/ClockTime.h"
+#include "tool/shared/output/Failure.h"
+
+#include <filesystem>
+#include <unistd.h>
+
+namespace {
+
+constexpr std::pair kWidths{16, 16384};
+constexpr std::pair kHeights{8, 4096};
+
+struct OverviewArguments {
+    std::vector<std::string> files;
+    std::string png, svg;
+    PictureSettings picture;
+    SoundLength start;
+    std::optional<SoundLength> end, frames;
+    PictureColors colors = defaultColors();
+    OutputFile::Existing existing = OutputFile::Existing::refuse;
+    bool fromStored = false;
+    bool store = false;
+    EditOptions edit;
+
+    bool draws() const { return !png.empty() || !svg.empty(); }
+};
+
+void writePicture(const std::string& out, const std::string& path, OutputFile::Existing existing,
+                  const std::string& bytes)
+{
+    if (out != "-") {
+        writeOutputFile(out, path, existing, [&](const Sink& sink) { sink(bytes); });
+        return;
+    }
+    Output::standard().write(bytes);
+    if (!Output::standard().flush())
+        throw Failure("the picture could not be written whole");
+}
+
+void drawPictures(const std::string& path, const Waveform& waveform, const OverviewArguments& arguments)
+{
+    PictureSettings settings = arguments.picture;
+    const double rate = waveform.sampleRate;
+    const std::uint64_t start = arguments.start.at(rate);
+    settings.start = static_cast<double>(start) / rate;
+    if (settings.start >= waveform.seconds())
+        throw Failure(fmt::format("ends at {}, ahead of the start of the picture", durationText(waveform.seconds())));
+    if (arguments.end)
+        settings.end = static_cast<double>(arguments.end->at(rate)) / rate;
+    if (arguments.frames)
+        settings.end = static_cast<double>(start) / rate + static_cast<double>(arguments.frames->at(rate)) / rate;
+    if (settings.end <= settings.start)
+        throw Failure("there is nothing between the start and the end of the picture");
+    const WaveformPicture picture = pictureOf(waveform, settings);
+    if (!arguments.png.empty())
+        writePicture(arguments.png, path, arguments.existing, pngOf(picture, arguments.colors));
+    if (!arguments.svg.empty())
+        writePicture(arguments.svg, path, arguments.existing,
+                     svgOf(picture, arguments.colors, std::filesystem::path(path).filename().string()));
+}
+
+// Ahead of the reading, which may take minutes. One that is the file itself is refused later, whatever is asked for.
+void requireFreeNames(const std::string& path, const OverviewArguments& arguments)
+{
+    std::error_code error;
+    for (const std::string& out : {arguments.png, arguments.svg})
+        if (!out.empty() && out != "-" && !std::filesystem::equivalent(out, path, error))
+            requireFreeName(out, arguments.existing);
+}
+
+void workOn(const std::string& path, const OverviewArguments& arguments, OverviewReport& report)
+{
+    OverviewDeeds deeds{.png = arguments.png,
+                        .svg = arguments.svg,
+                        .width = arguments.picture.width,
+                        .height = arguments.picture.height,
+                        .store = {},
+                        .dryRun = arguments.edit.dryRun};
+    requireFreeNames(path, arguments);
+    std::optional<SafeEdit> edit; // ahead of the reading, so that it notices changes made meanwhile
+    FileAccess access;
+    if (arguments.store) {
+        edit.emplace(path, arguments.edit);
+        requireRoomForOverview(path);
+    } else {
+        access = accessForReading(path, {.quiet = arguments.edit.quiet});
+    }
+    FileOverview overview =
+        arguments.fromStored ? FileOverview::stored(path) : FileOverview::computed(path, arguments.edit.quiet);
+    if (arguments.draws())
+        drawPictures(path, overview.waveform(), arguments);
+    if (edit)
+        deeds.store = storeOverview(*edit, overview, arguments.edit);
+    report.add(path, overview, deeds);
+}
+
+// What the parser cannot see: options that make sense only together, or not together.
+void requireSense(const OverviewArguments& arguments, const CLI::App& verb, const OutputOptions& output)
+{
+    const auto given = [&verb](const char* option) { return verb.count(option) > 0; };
+    if (arguments.draws() && arguments.files.size() > 1)
+        throw CLI::ValidationError("--png and --svg draw one file at a time");
+    if (!arguments.draws())
+        for (const char* const option :
+             {"--width", "--height", "--start", "--end", "--frames", "--colors", "--scale", "--force"})
+            if (given(option))
+                throw CLI::ValidationError(std::string(option) + " is about a picture: --png or --svg says where to");
+    if (!arguments.store)
+        for (const char* const option : {"--in-place", "--dry-run", "--backup", "--keep-times", "--timeout"})
+            if (given(option))
+                throw CLI::ValidationError(std::string(option) + " is about --store");
+    if (arguments.store && arguments.fromStored)
+        throw CLI::ValidationError("--store computes the overview, --stored does not");
+    requireOrder(arguments.start, arguments.end);
+    if (arguments.draws() && arguments.png == arguments.svg)
+        throw CLI::ValidationError("--png and --svg name the same file");
+    const bool toOutput = arguments.png == "-" || arguments.svg == "-";
+    if (toOutput && output.json)
+        throw CLI::ValidationError("--json and a picture cannot both go to standard output");
+    if (arguments.png == "-" && isTerminal(STDOUT_FILENO))
+        throw CLI::ValidationError("a PNG does not go to a terminal: name a file");
+}
+
+bool runOverview(OverviewArguments& arguments, const CLI::App& verb, OutputOptions output)
+{
+    requireSense(arguments, verb, output);
+    arguments.edit.quiet = output.quiet;
+    if (arguments.png == "-" || arguments.svg == "-") // nothing but the picture
+        output.quiet = true;
+    OverviewReport report(output, arguments.files);
+    bool good = true;
+    for (const std::string& path : arguments.files) {
+        if (Output::standard().failed())
+            break;
+        try {
+            workOn(path, arguments, report);
+        } catch (const Failure& failure) {
+            good = false;
+            report.addFailure(path, failure.what());
+            reportFailure(path, failure.what());
+        }
+    }
+    report.finish();
+    return good;
+}
+
+void addSize(CLI::App& verb, const std::string& name, int& pixels, std::pair<int, int> range)
+{
+    verb.add_option(name, pixels,
+                    fmt::format("Its size in pixels, {} to {}; else {}", range.first, range.second, pixels))
+        ->option_text("N")
+        ->check(CLI::Range(range.first, range.second).description(""));
+}
+
+void addPictureOptions(CLI::App& verb, OverviewArguments& arguments)
+{
+    CommandLine::addPath(verb, "--png", arguments.png, "Draw a PNG; \"-\" is standard output")->option_text("OUT");
+    CommandLine::addPath(verb, "--svg", arguments.svg, "Draw an SVG; \"-\" is standard output")->option_text("OUT");
+    CommandLine::addForceOption(verb, arguments.existing);
+    addSize(verb, "--width", arguments.picture.width, kWidths);
+    addSize(verb, "--height", arguments.picture.height, kHeights);
+    addSoundRange(verb, {.start = [&arguments](const SoundLength& start) { arguments.start = start; },
+                         .end = [&arguments](const SoundLength& end) { arguments.end = end; },
+                         .frames = [&arguments](const SoundLength& frames) { arguments.frames = frames; }});
+    verb.add_flag("--scale", arguments.picture.scale, "Show a scale of the amplitude, in decibels");
+    verb.add_option_function<std::string>(
+            "--colors",
+            [&arguments](const std::string& text) {
+                arguments.colors = colorsFromText(text).value_or(arguments.colors);
+            },
+            "WAVE,BACKGROUND[,AXIS] as RRGGBB, the background also none; or one of: " + themeNames())
+        ->option_text("COLORS")
+        ->check(CLI::Validator(
+            [](std::string& text) {
+                return colorsFromText(text) ? ""
+                                            : "\"" + printable(text) + "\" is neither WAVE,BACKGROUND[,AXIS], as in " +
+                                                  "1f6feb,ffffff, nor one of " + themeNames();
+            },
+            ""));
+}
+
+void declareOverview(CommandLine& commandLine)
+{
+    static OverviewArguments arguments;
+    static CLI::App* verb = nullptr;
+    verb = &commandLine.addVerb("overview", "Show waveforms: in the terminal, as numbers, as a PNG or SVG; store them",
+                                [&commandLine] { return runOverview(arguments, *verb, commandLine.output()); });
+    CommandLine::addFiles(*verb, arguments.files)->required();
+    addPictureOptions(*verb, arguments);
+    verb->add_flag("--stored", arguments.fromStored, "Take the overview that is stored in the file, not the sound");
+    verb->add_flag("--store", arguments.store, "Store the overview in the file");
+    CommandLine::addEditOptions(*verb, arguments.edit);
+}
+
+const VerbRegistration registration{50, declareOverview};
+
+} // namespace

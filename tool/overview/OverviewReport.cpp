@@ -1,0 +1,151 @@
+#include "tool/overview/OverviewReport.h"
+
+#include "tool/overview/Sparkline.h"
+#include "tool/shared/output/ClockTime.h"
+#include "tool/shared/output/Terminal.h"
+
+#include <nlohmann/json.hpp>
+
+#include <algorithm>
+
+namespace {
+
+constexpr int kDurationWidth = 11; // "1:02:03.456"
+constexpr int kGaps = 4;
+constexpr int kLeastSparkline = 8;
+constexpr int kSparklineInPipes = 64;
+
+std::string withThousands(std::int64_t number)
+{
+    std::string digits = std::to_string(number);
+    for (std::size_t i = digits.size(); i > 3; i -= 3)
+        digits.insert(i - 3, ",");
+    return digits;
+}
+
+// The end of a path says more than its beginning.
+std::string shortened(const std::string& name, int width)
+{
+    if (displayWidth(name) <= width)
+        return name;
+    std::string_view rest = name;
+    const auto isInside = [](char c) { return (static_cast<unsigned char>(c) & 0xC0) == 0x80; };
+    while (!rest.empty() && displayWidth(rest) > width - 1) {
+        rest.remove_prefix(1);
+        while (!rest.empty() && isInside(rest.front()))
+            rest.remove_prefix(1);
+    }
+    return "…" + std::string(rest);
+}
+
+OverviewPoint extremes(const Waveform& waveform)
+{
+    OverviewPoint extremes = waveform.points.front();
+    for (const OverviewPoint& point : waveform.points) {
+        extremes.minimum = std::min(extremes.minimum, point.minimum);
+        extremes.maximum = std::max(extremes.maximum, point.maximum);
+    }
+    return extremes;
+}
+
+std::string storeText(const StoreResult& store, bool dryRun, std::size_t points)
+{
+    const std::string count = withThousands(static_cast<std::int64_t>(points)) + (points == 1 ? " point" : " points");
+    if (store.stored)
+        return store.changed ? fmt::format("{} its overview, {}", dryRun ? "would store" : "stored", count)
+                             : "unchanged: its overview is stored already";
+    return store.changed ? fmt::format("{} its overview, since it is silent", dryRun ? "would remove" : "removed")
+                         : "unchanged: a CAF file stores no overview of silence";
+}
+
+} // namespace
+
+OverviewReport::OverviewReport(const OutputOptions& options, const std::vector<std::string>& files)
+    : form_(outputForm(options)),
+      color_(usesColor(options.color)),
+      several_(files.size() > 1),
+      columns_(terminalColumns())
+{
+    for (const std::string& path : files)
+        nameWidth_ = std::max(nameWidth_, displayWidth(printable(path)));
+    nameWidth_ = std::min(nameWidth_, std::max(columns_ / 3, 8));
+}
+
+void OverviewReport::add(const std::string& path, const FileOverview& overview, const OverviewDeeds& deeds)
+{
+    const Waveform waveform = overview.waveform();
+    if (form_ == Form::json) {
+        addJson(path, waveform, deeds);
+    } else if (form_ != Form::none && deeds.any()) {
+        addDeeds(path, waveform, deeds);
+    } else if (form_ == Form::table) {
+        addSparkline(path, waveform);
+    } else if (form_ == Form::lines) {
+        const OverviewPoint range = extremes(waveform);
+        output_.print("{}\t{:.6f}\t{}\t{}\t{}\t{}\n", printable(path), waveform.seconds(), waveform.frames,
+                      range.minimum, range.maximum, sparkline(waveform, kSparklineInPipes));
+    }
+    if (form_ == Form::table)
+        output_.flush(); // the next file may take its time
+}
+
+void OverviewReport::addSparkline(const std::string& path, const Waveform& waveform)
+{
+    const std::string name = shortened(printable(path), nameWidth_);
+    const std::string padding(static_cast<std::size_t>(std::max(nameWidth_ - displayWidth(name), 0)), ' ');
+    const int cells = std::max(columns_ - nameWidth_ - kDurationWidth - kGaps, kLeastSparkline);
+    output_.print("{}{}  {:>{}}  {}{}{}\n", name, padding, durationText(waveform.seconds()), kDurationWidth,
+                  color_ ? "\x1b[36m" : "", sparkline(waveform, cells), color_ ? "\x1b[0m" : "");
+}
+
+void OverviewReport::addDeeds(const std::string& path, const Waveform& waveform, const OverviewDeeds& deeds)
+{
+    for (const std::string& out : {deeds.png, deeds.svg})
+        if (!out.empty() && out != "-")
+            output_.print("{}: drawn to {}, {} x {}\n", printable(path), printable(out), deeds.width, deeds.height);
+    if (deeds.store)
+        output_.print("{}: {}{}\n", printable(path), storeText(*deeds.store, deeds.dryRun, waveform.points.size()),
+                      deeds.store->backup.empty() ? "" : "; backup " + printable(deeds.store->backup));
+}
+
+void OverviewReport::addJson(const std::string& path, const Waveform& waveform, const OverviewDeeds& deeds)
+{
+    beginJson();
+    // By hand, since twelve hours are eight million points.
+    output_.print("{{\"path\":{},\"frames\":{},\"framesPerPoint\":{},\"points\":[", jsonText(path), waveform.frames,
+                  kOverviewFramesPerPoint);
+    bool first = true;
+    for (const OverviewPoint& point : waveform.points)
+        output_.print("{}[{},{}]", std::exchange(first, false) ? "" : ",", point.minimum, point.maximum);
+    output_.print("]");
+    for (const auto& [key, out] : {std::pair("png", deeds.png), std::pair("svg", deeds.svg)})
+        if (!out.empty())
+            output_.print(",\"{}\":{}", key, jsonText(out));
+    if (deeds.store) {
+        output_.print(",\"stored\":{},\"changed\":{},\"dryRun\":{}", deeds.store->stored, deeds.store->changed,
+                      deeds.dryRun);
+        if (!deeds.store->backup.empty())
+            output_.print(",\"backup\":{}", jsonText(deeds.store->backup));
+    }
+    output_.print("}}");
+}
+
+void OverviewReport::addFailure(const std::string& path, const std::string& text)
+{
+    if (form_ != Form::json)
+        return;
+    beginJson();
+    output_.write(jsonText({{"path", path}, {"error", text}}));
+}
+
+void OverviewReport::beginJson()
+{
+    if (several_)
+        output_.write(std::exchange(first_, false) ? "[\n" : ",\n");
+}
+
+void OverviewReport::finish()
+{
+    if (form_ == Form::json)
+        output_.write(several_ ? "\n]\n" : "\n");
+}

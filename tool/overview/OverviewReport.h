@@ -1,0 +1,44 @@
+// What `ktfiles overview` prints of each file: a sparkline, a line for scripts, JSON, or what was drawn and stored.
+#pragma once
+
+#include "tool/overview/FileOverview.h"
+#include "tool/overview/OverviewStore.h"
+#include "tool/shared/output/Output.h"
+
+#include <optional>
+#include <string>
+#include <vector>
+
+/// What was done with a file's overview beside showing it.
+struct OverviewDeeds {
+    std::string png, svg; // the files that were drawn; empty or "-": none to tell of
+    int width = 0, height = 0;
+    std::optional<StoreResult> store;
+    bool dryRun = false;
+
+    bool any() const { return !png.empty() || !svg.empty() || store; }
+};
+
+class OverviewReport {
+public:
+    /// All files that will come, for the width of the names.
+    OverviewReport(const OutputOptions& options, const std::vector<std::string>& files);
+
+    void add(const std::string& path, const FileOverview& overview, const OverviewDeeds& deeds);
+    void addFailure(const std::string& path, const std::string& text);
+    void finish();
+
+private:
+    void addSparkline(const std::string& path, const Waveform& waveform);
+    void addDeeds(const std::string& path, const Waveform& waveform, const OverviewDeeds& deeds);
+    void addJson(const std::string& path, const Waveform& waveform, const OverviewDeeds& deeds);
+    void beginJson();
+
+    Form form_;
+    bool color_;
+    bool several_;
+    bool first_ = true;
+    int nameWidth_ = 0;
+    int columns_;
+    Output& output_ = Output::standard();
+};

@@ -1,0 +1,59 @@
+// A raster of palette indices: a waveform picture knows only the background, the wave on it and the axis on it.
+#pragma once
+
+#include "tool/overview/PictureColors.h"
+
+#include <array>
+#include <cstdint>
+#include <vector>
+
+class Raster {
+public:
+    Raster(int width, int height);
+
+    int width() const { return width_; }
+    int height() const { return height_; }
+    /// Row by row, without gaps.
+    const std::vector<std::uint8_t>& pixels() const { return pixels_; }
+    static std::array<Color, 256> palette(const PictureColors& colors);
+
+    /// The wave over what is there, 0 to 1; nothing of it leaves the pixel alone.
+    void putWave(int x, int y, float coverage)
+    {
+        if (const int level = static_cast<int>(coverage * kWaveLevels + 0.5F); level > 0)
+            at(x, y) = static_cast<std::uint8_t>(level);
+    }
+    /// A part of the axis, 0 to 1; the stronger of two stays. Outside of the raster nothing happens.
+    void putAxis(int x, int y, float coverage);
+    /// A rectangle of the axis; edges between pixels are softened.
+    void fillAxis(float left, float top, float right, float bottom, float tone);
+
+private:
+    static constexpr int kWaveLevels = 191; // indices 1 to 191; 0 is the background
+    static constexpr int kAxisLevels = 64;  // indices 192 to 255
+
+    std::uint8_t& at(int x, int y)
+    {
+        return pixels_[static_cast<std::size_t>(y) * static_cast<std::size_t>(width_) + static_cast<std::size_t>(x)];
+    }
+
+    int width_, height_;
+    std::vector<std::uint8_t> pixels_;
+};
+
+/// How much of each pixel of a column is covered by spans of it.
+class ColumnCoverage {
+public:
+    explicit ColumnCoverage(int rows) : changes_(static_cast<std::size_t>(rows) + 2), coverage_(changes_.size()) {}
+
+    /// Adds `weight` times the span, cut to the column.
+    void add(float top, float bottom, float weight);
+    /// The coverage of every row, by the spans added since the last call.
+    const std::vector<float>& take();
+
+private:
+    void addEdge(float y, float weight);
+
+    std::vector<float> changes_; // of the coverage, from row to row
+    std::vector<float> coverage_;
+};

@@ -1,0 +1,9 @@
+// A waveform in one line of text.
+#pragma once
+
+#include "tool/overview/WaveformOutline.h"
+
+#include <string>
+
+/// `cells` characters, from "▁" for silence to "█" for full scale, each the peak of its share of the file.
+std::string sparkline(const Waveform& waveform, int cells);

@@ -1,0 +1,221 @@
+// ktfiles project: project packages, what they say of themselves, their media, folders and backups.
+#include "platform/ApplicationInfo.h"
+#include "tool/project/ProjectArguments.h"
+#include "tool/project/ProjectBackup.h"
+#include "tool/project/ProjectEdit.h"
+#include "tool/project/ProjectMedia.h"
+#include "tool/project/ProjectPackage.h"
+#include "tool/project/ProjectReport.h"
+#include "tool/project/ProjectRestore.h"
+#include "tool/shared/arguments/CommandLine.h"
+#include "tool/shared/arguments/TimeoutOption.h"
+#include "tool/shared/output/Failure.h"
+
+#include <nlohmann/json.hpp>
+
+#include <cstdlib>
+#include <limits>
+
+namespace {
+
+constexpr int kMostBackups = 100; // that two digits name
+
+/// Failures go to standard error, and into the JSON where that is asked for.
+bool runOn(const std::string& path, const OutputOptions& output, const std::function<void()>& work)
+{
+    if (path.empty())
+        throw CLI::RequiredError("PACKAGE");
+    platform::setApplicationInfo({"ktfiles", KTFILES_VERSION});
+    return reportingFailures(path, [&] {
+        try {
+            work();
+        } catch (const Failure& failure) {
+            if (output.json)
+                Output::standard().print("{}\n", jsonText({{"path", path}, {"error", failure.what()}}));
+            throw;
+        }
+    });
+}
+
+void backUp(const ProjectArguments& arguments, const OutputOptions& output)
+{
+    editProject(arguments.package, arguments.wait, [&](const std::string& package) {
+        const auto project = openProject(package);
+        const long alternative = alternativeOf(*project, arguments.alternative);
+        const std::string name = makeBackup(*project, alternative, arguments.keep, arguments.edit.dryRun, output.quiet);
+        nlohmann::ordered_json json{{"alternative", alternative}, {"dryRun", arguments.edit.dryRun}};
+        if (!name.empty())
+            json["backup"] = name;
+        printProjectEdit(arguments.package, output, json,
+                         name.empty() ? fmt::format("would copy alternative {} to a new backup", alternative)
+                                      : fmt::format("copied alternative {} to backup {}", alternative, name));
+    });
+}
+
+void renameAlternative(const ProjectArguments& arguments, const OutputOptions& output)
+{
+    editProject(arguments.package, arguments.wait, [&](const std::string& package) {
+        const auto project = openProject(package);
+        const auto url =
+            ProjectInformation::projectInformationURLForBundleURL(project->projectURL(), CreateDirectories::no);
+        SafeEdit edit(url->posixPath(), arguments.edit); // ahead of the reading, so that it notices other changes
+        auto info = ProjectInformation::infoDictionaryFromProjectBundleURL(project->projectURL());
+        auto names = project->alternativeNames();
+        const auto found = names.find(std::to_string(arguments.index));
+        if (!info)
+            throw Failure("Resources/ProjectInformation.plist holds a value that would not be kept");
+        if (found == names.end())
+            throw Failure(fmt::format("has no alternative {}", arguments.index));
+        const std::string before = project->variationNameForIndex(arguments.index).value_or("");
+        found->second = arguments.name;
+        (*info)[ProjectInfoKey::variantNames] = std::move(names);
+        std::string backup;
+        if (!arguments.edit.dryRun)
+            backup = edit.apply(EditScope::wholeFile(), [&](const std::string& path) {
+                platform::Error error;
+                const auto target = platform::URL::createWithFileSystemPath(platform::String::fromUTF8(path),
+                                                                            platform::PathStyle::posix, false);
+                if (!ProjectInformation::writeInfoDictionaryToURL(
+                        ProjectInformation::infoDictionaryForProjectBundleURL(*info, project->projectURL()), target,
+                        &error))
+                    throw Failure(error.description);
+            });
+        nlohmann::ordered_json json{{"alternative", arguments.index},
+                                    {"name", arguments.name},
+                                    {"before", before},
+                                    {"dryRun", arguments.edit.dryRun}};
+        if (!backup.empty())
+            json["backup"] = backup;
+        printProjectEdit(arguments.package, output, json,
+                         fmt::format("alternative {} {} \"{}\"{}", arguments.index,
+                                     arguments.edit.dryRun ? "would be called" : "is called", printable(arguments.name),
+                                     backup.empty() ? "" : ", the old names are in " + printable(backup)));
+    });
+}
+
+void addPackage(CLI::App& verb, ProjectArguments& arguments)
+{
+    CommandLine::addFile(verb, arguments.package, "PACKAGE")->description("The project package");
+}
+
+CLI::Validator indexRange()
+{
+    return CLI::Range(0L, long{std::numeric_limits<std::uint32_t>::max()}).description("");
+}
+
+void addAlternative(CLI::App& verb, ProjectArguments& arguments)
+{
+    verb.add_option("--alternative", arguments.alternative, "The alternative's number, else the active one")
+        ->option_text("N")
+        ->check(indexRange());
+}
+
+void declareReading(CommandLine& commandLine, CLI::App& project, ProjectArguments& arguments)
+{
+    const OutputOptions& output = commandLine.output();
+    CLI::App& media = commandLine.addVerb(
+        "media", "List the media files that a project uses",
+        [&] {
+            return runOn(arguments.package, output, [&] {
+                printProjectMedia(arguments.package, *openProject(arguments.package), arguments.alternative,
+                                  arguments.missing, output);
+            });
+        },
+        &project);
+    addPackage(media, arguments);
+    media.add_flag("--missing", arguments.missing, "Only those that are not there");
+    media.add_option("--alternative", arguments.alternative, "Only those of one alternative")
+        ->option_text("N")
+        ->check(indexRange());
+
+    CLI::App& dirs = commandLine.addVerb(
+        "dirs", "List a project's media and working folders, or create them",
+        [&] {
+            return runOn(arguments.package, output, [&] {
+                const auto print = [&](const std::string& package) {
+                    printProjectDirectories(arguments.package, projectFolder(package), arguments.alternative,
+                                            arguments.create, output);
+                };
+                if (arguments.create)
+                    editProject(arguments.package, arguments.wait, print);
+                else
+                    print(arguments.package);
+            });
+        },
+        &project);
+    addPackage(dirs, arguments);
+    dirs.add_flag("--create", arguments.create, "Create those that are missing");
+    addAlternative(dirs, arguments);
+    addTimeout(dirs, arguments.wait.timeoutSeconds);
+}
+
+void declareEdits(CommandLine& commandLine, CLI::App& project, ProjectArguments& arguments)
+{
+    const OutputOptions& output = commandLine.output();
+    const auto edit = [&](const char* name, const char* description,
+                          void (*work)(const ProjectArguments&, const OutputOptions&)) -> CLI::App& {
+        CLI::App& verb = commandLine.addVerb(
+            name, description,
+            [&, work] {
+                arguments.edit.quiet = arguments.wait.quiet = output.quiet;
+                return runOn(arguments.package, output, [&] { work(arguments, output); });
+            },
+            &project);
+        addPackage(verb, arguments);
+        return verb;
+    };
+    CLI::App& backup = edit("backup", "Back up an alternative's project data", backUp);
+    addAlternative(backup, arguments);
+    backup.add_option("--keep", arguments.keep, "Delete the oldest backups, so that there are N with the new one")
+        ->option_text("N")
+        ->check(CLI::Range(1, kMostBackups).description(""));
+    backup.add_flag("--dry-run", arguments.edit.dryRun, "Say what would be done, and do nothing");
+
+    CLI::App& back = edit("restore", "Exchange an alternative's project data with a backup's", restoreBackup);
+    back.add_option("BACKUP", arguments.backup, "The backup's name, such as 03")->option_text(" ")->required();
+    addAlternative(back, arguments);
+    back.add_flag("--dry-run", arguments.edit.dryRun, "Say what would be done, and do nothing");
+
+    CLI::App& settle =
+        edit("settle", "Complete an exchange with a backup that was cut short, or undo it", settleExchange);
+    CLI::Option* undo = settle.add_flag("--undo", arguments.undo, "Put everything back to where it was");
+    settle.add_flag("--forget", arguments.forget, "Leave everything where it is, and drop the record of the exchange")
+        ->excludes(undo);
+    CommandLine::addPath(settle, "--with", arguments.backup,
+                         "The backup's folder, where the record names one elsewhere")
+        ->option_text("FOLDER");
+    addAlternative(settle, arguments);
+    settle.add_flag("--dry-run", arguments.edit.dryRun, "Say what would be done, and do nothing");
+
+    CLI::App& rename = edit("rename-alternative", "Give an alternative another name", renameAlternative);
+    rename.add_option("N", arguments.index, "The alternative's number")
+        ->option_text(" ")
+        ->required()
+        ->check(indexRange());
+    rename.add_option("NAME", arguments.name, "Its new name")->option_text(" ")->required();
+    CommandLine::addEditOptions(rename, arguments.edit);
+
+    for (CLI::App* verb : {&backup, &back, &settle, &rename})
+        if (CLI::Option* timeout = verb->get_option_no_throw("--timeout")) // of the edit options: for the package too
+            timeout->each([&arguments](const std::string& text) {
+                arguments.wait.timeoutSeconds = std::strtod(text.c_str(), nullptr);
+            });
+        else
+            addTimeout(*verb, arguments.wait.timeoutSeconds);
+}
+
+void declareProject(CommandLine& commandLine)
+{
+    static ProjectArguments arguments;
+    CLI::App& verb = commandLine.addVerb("project", "Show what a project package holds; back up and restore it", [&] {
+        return runOn(arguments.package, commandLine.output(),
+                     [&] { printProject(arguments.package, *openProject(arguments.package), commandLine.output()); });
+    });
+    addPackage(verb, arguments);
+    declareReading(commandLine, verb, arguments);
+    declareEdits(commandLine, verb, arguments);
+}
+
+const VerbRegistration registration{65, declareProject};
+
+} // namespace

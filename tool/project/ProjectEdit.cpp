@@ -1,0 +1,25 @@
+#include "tool/project/ProjectEdit.h"
+
+#include "tool/project/ProjectPackage.h"
+#include "tool/shared/access/FileAccess.h"
+#include "tool/shared/edits/TemporaryFile.h"
+
+void editProject(const std::string& package, const WaitOptions& wait,
+                 const std::function<void(const std::string& package)>& edit)
+{
+    const std::string resolved = resolvedFolder(package);
+    const FileAccess access = accessForWriting(resolved, platform::FileCoordinator::WritingOptions::none, wait);
+    const SignalHold hold;
+    edit(resolved);
+}
+
+bool endIsWanted()
+{
+    sigset_t waiting;
+    if (::sigpending(&waiting) != 0)
+        return false;
+    for (const int signal : {SIGINT, SIGTERM, SIGHUP})
+        if (sigismember(&waiting, signal) == 1)
+            return true;
+    return false;
+}

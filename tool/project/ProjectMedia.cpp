@@ -1,0 +1,98 @@
+#include "tool/project/ProjectMedia.h"
+
+#include "tool/project/ProjectPackage.h"
+#include "tool/shared/output/Failure.h"
+#include "tool/shared/output/Table.h"
+
+#include <nlohmann/json.hpp>
+
+#include <algorithm>
+#include <filesystem>
+
+using nlohmann::ordered_json;
+
+namespace {
+
+bool isThere(const std::string& path)
+{
+    std::error_code error;
+    return std::filesystem::exists(path, error);
+}
+
+void printRows(const std::vector<std::vector<std::string>>& rows, std::vector<Table::Column> columns,
+               const OutputOptions& options)
+{
+    const Form form = outputForm(options);
+    Output& output = Output::standard();
+    Table table(std::move(columns));
+    for (const auto& row : rows) {
+        if (form == Form::table)
+            table.add(row);
+        else if (form == Form::lines)
+            output.print("{}\t{}\t{}\n", row[0], row[1], row[2]);
+    }
+    if (form == Form::table)
+        table.print(output, usesColor(options.color));
+}
+
+constexpr int kDirectoryCount = 20;
+
+} // namespace
+
+void printProjectMedia(const std::string& path, ProjectInformation& project, std::optional<long> alternative,
+                       bool onlyMissing, const OutputOptions& options)
+{
+    if (alternative)
+        alternativeOf(project, alternative); // or it says that there is none
+    std::vector<std::vector<std::string>> rows;
+    ordered_json media = ordered_json::array();
+    for (const ProjectMediaList& list : kProjectMediaLists) {
+        const ProjectFileSet files = alternative ? project.filesUsedByVariantIndex(list.kind, *alternative)
+                                                 : project.filesUsedByAnyVariant(list.kind);
+        std::vector<std::string> sorted(files.begin(), files.end());
+        std::sort(sorted.begin(), sorted.end());
+        for (const std::string& file : sorted) {
+            const bool exists = isThere(file);
+            if (exists && onlyMissing)
+                continue;
+            if (options.json)
+                media.push_back({{"key", list.key}, {"file", file}, {"exists", exists}});
+            else
+                rows.push_back({list.name, exists ? "" : "missing", printable(file)});
+        }
+    }
+    if (options.json)
+        Output::standard().print("{}\n", jsonText({{"path", path}, {"media", std::move(media)}}));
+    printRows(rows, {{"KIND"}, {"STATE"}, {"FILE"}}, options);
+}
+
+void printProjectDirectories(const std::string& path, const CFileRef& base, std::optional<long> alternative,
+                             bool create, const OutputOptions& options)
+{
+    const auto project = ProjectInformation::initWithProjectURL(base.URL());
+    const long index = alternative.value_or(project ? std::max(project->lastActiveVariation(), 0L) : 0);
+    std::vector<std::vector<std::string>> rows;
+    ordered_json directories = ordered_json::array();
+    for (int value = 0; value < kDirectoryCount; ++value) {
+        const auto ask = [&](bool creates) {
+            return GetProjectDirectoryRefForBase(base, static_cast<TTypeDir_Prj>(value), creates,
+                                                 kProjectTypeFromProject, index);
+        };
+        const CFileRef directory = ask(false);
+        if (!directory.IsValid()) // this kind of project has none
+            continue;
+        if (create && !ask(true).IsValid())
+            throw Failure("this folder cannot be created: " + std::string(directory));
+        const bool exists = directory.IsFolder();
+        if (options.json)
+            directories.push_back({{"type", value}, {"directory", std::string(directory)}, {"exists", exists}});
+        else
+            rows.push_back({std::to_string(value), exists ? "" : "missing", printable(std::string(directory))});
+    }
+    if (options.json)
+        Output::standard().print("{}\n", jsonText({{"path", path},
+                                                   {"directoryType", static_cast<int>(GetProjectDirectoryType(base))},
+                                                   {"layout", static_cast<int>(GetProjectLayout(base))},
+                                                   {"directories", std::move(directories)}}));
+    printRows(rows, {{"TYPE", Align::right}, {"STATE"}, {"FOLDER"}}, options);
+}

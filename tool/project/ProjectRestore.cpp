@@ -1,0 +1,112 @@
+#include "tool/project/ProjectRestore.h"
+
+#include "tool/project/ProjectEdit.h"
+#include "tool/project/ProjectPackage.h"
+#include "tool/project/ProjectReport.h"
+#include "tool/shared/output/Failure.h"
+#include "tool/shared/output/Terminal.h"
+
+#include <fmt/format.h>
+#include <nlohmann/json.hpp>
+
+#include <filesystem>
+#include <system_error>
+
+namespace {
+
+constexpr const char* kUnreadable =
+    "an exchange with a backup was cut short, and its record cannot be read: project settle --forget drops it";
+
+bool isSameFolder(const platform::URL& a, const platform::URL& b)
+{
+    std::error_code error;
+    return std::filesystem::equivalent(a.posixPath(), b.posixPath(), error);
+}
+
+platform::URLRef backupNamed(const ProjectInformation& project, long alternative, const std::string& name)
+{
+    const auto base =
+        ProjectInformation::backupsBaseURLForBundleURL(project.projectURL(), alternative, CreateDirectories::no);
+    const bool isName = !name.starts_with('.') && name.find('/') == name.npos;
+    if (base)
+        requireNoLink(project.projectURL()->posixPath(), base->posixPath());
+    auto url = base && isName ? base->appendingPathComponent(platform::String::fromUTF8(name), true) : nullptr;
+    if (!url || !std::filesystem::is_directory(url->posixPath()))
+        throw Failure(fmt::format("alternative {} has no backup \"{}\"", alternative, name));
+    requireNoLink(project.projectURL()->posixPath(), url->posixPath());
+    return url;
+}
+
+} // namespace
+
+void restoreBackup(const ProjectArguments& arguments, const OutputOptions& output)
+{
+    editProject(arguments.package, arguments.wait, [&](const std::string& package) {
+        const auto project = openProject(package);
+        const long alternative = alternativeOf(*project, arguments.alternative);
+        const platform::URLRef backup = backupNamed(*project, alternative, arguments.backup);
+        const auto interrupted =
+            ProjectInformation::interruptedExchangeForBundleURL(project->projectURL(), alternative);
+        if (interrupted && !interrupted->backupURL)
+            throw Failure(kUnreadable);
+        const bool completes = interrupted && isSameFolder(*interrupted->backupURL, *backup);
+        const bool wasComplete = interrupted && !completes && interrupted->isComplete;
+        platform::Error error;
+        if (!arguments.edit.dryRun &&
+            !ProjectInformation::exchangeDataOfProjectAtURL(project->projectURL(), alternative, backup, &error))
+            throw Failure(error.description);
+        std::string sentence;
+        if (interrupted)
+            sentence =
+                fmt::format("found an exchange with backup {} that was cut short{}; {}; ",
+                            backupName(*interrupted, *project, alternative), wasComplete ? " when all was done" : "",
+                            arguments.edit.dryRun ? (completes     ? "would complete it"
+                                                     : wasComplete ? "would leave it so"
+                                                                   : "would undo it")
+                            : completes           ? "completed it"
+                            : wasComplete         ? "left it so"
+                                                  : "undid it");
+        sentence += fmt::format("alternative {} {} the data of backup {}, which {} what the alternative had",
+                                alternative, arguments.edit.dryRun ? "would have" : "has", backupName(backup),
+                                arguments.edit.dryRun ? "would have" : "has");
+        nlohmann::ordered_json json{
+            {"alternative", alternative}, {"backup", backupName(backup)}, {"dryRun", arguments.edit.dryRun}};
+        if (interrupted)
+            json["interruptedExchange"] = backupName(*interrupted, *project, alternative);
+        printProjectEdit(arguments.package, output, json, printable(sentence));
+    });
+}
+
+void settleExchange(const ProjectArguments& arguments, const OutputOptions& output)
+{
+    editProject(arguments.package, arguments.wait, [&](const std::string& package) {
+        const auto project = openProject(package);
+        const long alternative = alternativeOf(*project, arguments.alternative);
+        const auto interrupted =
+            ProjectInformation::interruptedExchangeForBundleURL(project->projectURL(), alternative);
+        if (!interrupted)
+            throw Failure(fmt::format("no exchange of alternative {} was cut short", alternative));
+        if (!interrupted->backupURL && !arguments.forget)
+            throw Failure(kUnreadable);
+        const std::string backup = backupName(*interrupted, *project, alternative);
+        if (backup.starts_with('/') && arguments.backup.empty() && !arguments.forget)
+            throw Failure("the exchange that was cut short is one with " + printable(backup) +
+                          "; --with says that this folder is meant");
+        const SettleExchange how = arguments.forget ? SettleExchange::forget
+                                   : arguments.undo ? SettleExchange::undo
+                                                    : SettleExchange::complete;
+        const auto with = arguments.backup.empty() ? platform::URLRef() : projectFolder(arguments.backup).URL();
+        platform::Error error;
+        if (!arguments.edit.dryRun && !ProjectInformation::settleInterruptedExchangeForBundleURL(
+                                          project->projectURL(), alternative, how, with, &error))
+            throw Failure(error.description);
+        const char* const done = arguments.forget ? "forgotten" : arguments.undo ? "undone" : "completed";
+        nlohmann::ordered_json json{{"alternative", alternative}, {"settled", done}, {"dryRun", arguments.edit.dryRun}};
+        if (!backup.empty())
+            json["backup"] = backup;
+        printProjectEdit(arguments.package, output, json,
+                         fmt::format("the exchange of alternative {} with {} {} {}", alternative,
+                                     backup.empty() ? "an unknown backup" : "backup " + printable(backup),
+                                     arguments.edit.dryRun ? "would be" : "is", done));
+    });
+}

@@ -1,0 +1,167 @@
+// ktfiles scan: every loop below folders, one record each.
+#include "tool/scan/OrderedWork.h"
+#include "tool/scan/ScanProgress.h"
+#include "tool/scan/ScanRecord.h"
+#include "tool/shared/arguments/CommandLine.h"
+#include "tool/shared/input/FolderWalk.h"
+#include "tool/shared/looptags/LoopTags.h"
+#include "tool/shared/output/Failure.h"
+
+#include <algorithm>
+#include <unistd.h>
+
+namespace {
+
+// Files travel in batches, which cost the threads less than one by one.
+constexpr std::size_t kBatch = 64;
+constexpr unsigned kBatchesPerThread = 8;
+constexpr unsigned kMostThreads = 256;
+
+using Batch = std::vector<ScanItem>;
+using Records = std::vector<ScanRecord>;
+using ScanWork = OrderedWork<Batch, Records>;
+
+struct ScanArguments {
+    std::vector<std::string> folders;
+    bool csv = false;
+    unsigned threads = 0;
+};
+
+struct BadFile {
+    std::string path;
+    std::string problem;
+};
+
+// Until `give` says that no more is wanted.
+void walkBatches(const std::vector<std::string>& folders, const std::function<bool(Batch)>& give)
+{
+    Batch batch;
+    FolderWalk walk(folders, [&](const std::string& path, const std::string& problem) {
+        batch.push_back({path, problem});
+        return batch.size() < kBatch || give(std::exchange(batch, {}));
+    });
+    if (walk.run() && !batch.empty())
+        give(std::move(batch));
+}
+
+// Counts ahead of the scan, which costs it little: no file is opened.
+void countInto(ScanProgress& progress, const std::vector<std::string>& folders, const std::stop_token& stop)
+{
+    std::int64_t files = 0;
+    FolderWalk walk(folders, [&](const std::string&, const std::string&) {
+        ++files;
+        return !stop.stop_requested();
+    });
+    if (walk.run())
+        progress.setTotal(files);
+}
+
+unsigned threadsFor(const ScanArguments& arguments)
+{
+    const unsigned threads = arguments.threads != 0 ? arguments.threads : std::thread::hardware_concurrency();
+    return std::clamp(threads, 1U, kMostThreads);
+}
+
+// Puts results out in their order, and keeps the bad files, to be listed at the end.
+class ResultWriter {
+public:
+    ResultWriter(ScanWriter& writer, ScanProgress& progress) : writer_(writer), progress_(progress) {}
+
+    /// False when no more is wanted.
+    bool add(Records records)
+    {
+        Output& output = Output::standard();
+        const bool sharesTerminal = progress_.isActive() && isTerminal(STDOUT_FILENO);
+        const bool prints = std::any_of(records.begin(), records.end(),
+                                        [](const ScanRecord& record) { return record.kind == ScanRecord::loop; });
+        if (sharesTerminal && prints)
+            progress_.hide();
+        for (ScanRecord& record : records)
+            if (record.kind == ScanRecord::loop)
+                writer_.add(record);
+            else if (record.kind == ScanRecord::bad)
+                bad_.push_back({std::move(record.path), std::move(record.text)});
+        if (sharesTerminal && prints)
+            output.flush();
+        if (output.failed())
+            return false;
+        progress_.advance(std::ssize(records));
+        return true;
+    }
+    const std::vector<BadFile>& bad() const { return bad_; }
+
+private:
+    ScanWriter& writer_;
+    ScanProgress& progress_;
+    std::vector<BadFile> bad_;
+};
+
+// The work of the threads, done without any.
+void scanHere(const std::vector<std::string>& folders, const std::function<Records(const Batch&)>& scan,
+              ResultWriter& results)
+{
+    walkBatches(folders, [&](const Batch& batch) { return results.add(scan(batch)); });
+}
+
+void scanByThreads(const ScanArguments& arguments, const std::function<Records(const Batch&)>& scan,
+                   ResultWriter& results)
+{
+    const unsigned threads = threadsFor(arguments);
+    ScanWork work(threads, std::size_t{threads} * kBatchesPerThread, scan);
+    const std::jthread walker = startedThread([&] {
+        walkBatches(arguments.folders, [&](Batch batch) { return work.give(std::move(batch)); });
+        work.close();
+    });
+    if (!walker.joinable()) // it and who takes its results must not be one thread
+        return scanHere(arguments.folders, scan, results);
+    while (auto records = work.take())
+        if (!results.add(std::move(*records)))
+            break;
+    work.stop();
+}
+
+bool runScan(const ScanArguments& arguments, const OutputOptions& options)
+{
+    if (arguments.csv && options.json)
+        throw CLI::ValidationError("--csv and --json exclude each other");
+    const ScanForm form = arguments.csv ? ScanForm::csv : scanForm(outputForm(options));
+    ScanWriter writer(form, usesColor(options.color));
+    ScanProgress progress(options.quiet);
+    ResultWriter results(writer, progress);
+    {
+        std::jthread counter;
+        if (progress.isActive())
+            counter = startedThread([&](const std::stop_token& stop) { countInto(progress, arguments.folders, stop); });
+        scanByThreads(
+            arguments,
+            [form](const Batch& batch) {
+                Records records;
+                for (const ScanItem& item : batch)
+                    records.push_back(scanFile(item, form));
+                return records;
+            },
+            results);
+    }
+    progress.hide();
+    writer.finish();
+    Output::standard().flush(); // ahead of what follows on standard error
+    for (const BadFile& file : results.bad())
+        reportFailure(file.path, file.problem);
+    return results.bad().empty();
+}
+
+void declareScan(CommandLine& commandLine)
+{
+    static ScanArguments arguments;
+    CLI::App& verb = commandLine.addVerb("scan", "List the loops below folders, with their tags",
+                                         [&commandLine] { return runScan(arguments, commandLine.output()); });
+    CommandLine::addFiles(verb, arguments.folders, "FOLDER")->required()->description("The folders");
+    verb.add_flag("--csv", arguments.csv, "Print comma-separated values (RFC 4180), with a header");
+    verb.add_option("-j,--threads", arguments.threads, "How many files are read at once; else one per core")
+        ->option_text("N")
+        ->check(CLI::Range(1U, kMostThreads).description(""));
+}
+
+const VerbRegistration registration{40, declareScan};
+
+} // namespace

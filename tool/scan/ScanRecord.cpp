@@ -1,0 +1,188 @@
+#include "tool/scan/ScanRecord.h"
+
+#include "tool/shared/looptags/LoopTags.h"
+#include "tool/shared/output/Failure.h"
+
+#include <nlohmann/json.hpp>
+
+#include <algorithm>
+#include <cctype>
+#include <iterator>
+#include <new>
+#include <unistd.h>
+
+namespace {
+
+// The columns of CSV, by the names that JSON has for them.
+constexpr const char* kColumns[] = {
+    "path",         "fileType",        "tempo",        "beatCount",      "midiRootNote",      "keyType",
+    "signatureTop", "signatureBottom", "loopFileType", "instrumentType", "instrumentSubType", "genre",
+    "descriptors",  "title",           "artist",       "copyright",      "comments",          "transients",
+    "chunks"};
+
+bool isCalledLoop(const std::string& path)
+{
+    const std::size_t dot = path.rfind('.');
+    std::string extension = dot == std::string::npos ? "" : path.substr(dot);
+    std::transform(extension.begin(), extension.end(), extension.begin(),
+                   [](unsigned char c) { return static_cast<char>(std::tolower(c)); });
+    return extension == ".aif" || extension == ".aiff" || extension == ".caf";
+}
+
+// As it is, which programs want; a terminal must not take part of a name for a command.
+void appendField(std::string& line, std::string_view bytes)
+{
+    static const bool onTerminal = isTerminal(STDOUT_FILENO);
+    const std::string fit = onTerminal ? printable(bytes) : std::string();
+    const std::string_view text = onTerminal ? fit : bytes;
+    if (text.find_first_of(",\"\r\n") == std::string_view::npos) {
+        line += text;
+        return;
+    }
+    line += '"';
+    for (const char c : text)
+        line.append(c == '"' ? 2 : 1, c);
+    line += '"';
+}
+
+// Numbers as they are, lists joined with commas, of chunks the ids.
+std::string fieldText(const nlohmann::ordered_json& value)
+{
+    if (value.is_string())
+        return value.get<std::string>();
+    if (value.is_object())
+        return value.at("id").get<std::string>();
+    if (!value.is_array())
+        return value.dump();
+    std::string joined;
+    for (const auto& each : value)
+        joined += (joined.empty() ? "" : ",") + fieldText(each);
+    return joined;
+}
+
+std::string csvLine(const std::string& path, const LoopTags& tags)
+{
+    nlohmann::ordered_json values = tagsWithoutTransients(tags);
+    values["fileType"] = fourCCText(tags.fileType);
+    values["transients"] = tags.transients.size();
+    std::string line;
+    appendField(line, path);
+    for (const char* column : std::span(kColumns).subspan(1)) {
+        line += ',';
+        if (const auto found = values.find(column); found != values.end())
+            appendField(line, fieldText(*found));
+    }
+    return line + "\r\n";
+}
+
+// The tags of `names`, made fit for one line of text.
+std::vector<std::string> cells(const LoopTags& tags, std::initializer_list<const char*> names)
+{
+    std::vector<std::string> row;
+    for (const char* name : names)
+        row.push_back(printable(tagText(tags, name)));
+    return row;
+}
+
+void fill(ScanRecord& record, const LoopTags& tags, ScanForm form)
+{
+    record.kind = ScanRecord::loop;
+    if (form == ScanForm::json) {
+        record.text = loopTagsJson(record.path, tags);
+    } else if (form == ScanForm::csv) {
+        record.text = csvLine(record.path, tags);
+    } else if (form == ScanForm::table) {
+        record.cells = cells(tags, {"tempo", "beatCount", "key", "signature", "instrumentType", "genre"});
+        record.cells.push_back(printable(record.path));
+    } else if (form == ScanForm::lines) {
+        record.text = printable(record.path) + "\t" + loopContainerName(tags.fileType);
+        for (const std::string& cell : cells(tags, {"tempo", "beatCount", "key", "signature", "instrumentType",
+                                                    "instrumentSubType", "genre", "descriptors"}))
+            record.text += "\t" + cell;
+        record.text += '\n';
+    }
+}
+
+} // namespace
+
+ScanForm scanForm(Form form)
+{
+    switch (form) {
+    case Form::table:
+        return ScanForm::table;
+    case Form::lines:
+        return ScanForm::lines;
+    case Form::json:
+        return ScanForm::json;
+    case Form::none:
+        break;
+    }
+    return ScanForm::none;
+}
+
+ScanRecord scanFile(const ScanItem& item, ScanForm form)
+{
+    ScanRecord record;
+    record.path = item.path;
+    const auto fail = [&](const std::string& text) {
+        record.kind = ScanRecord::bad;
+        record.text = text;
+    };
+    if (!item.problem.empty()) {
+        fail(item.problem);
+        return record;
+    }
+    try {
+        if (const LoopTags tags = readLoopTags(item.path); tags.isLoop())
+            fill(record, tags, form);
+    } catch (const NoLoopContainer& other) {
+        if (!other.isKnown() && isCalledLoop(item.path))
+            fail(other.what());
+    } catch (const Failure& failure) {
+        // A link that leads nowhere is of interest only when it should lead to a loop.
+        if (isCalledLoop(item.path) || ::access(item.path.c_str(), F_OK) == 0)
+            fail(failure.what());
+    } catch (const std::bad_alloc&) {
+        fail("out of memory");
+    }
+    return record;
+}
+
+// Rows are written as they come, so that the widths are set beforehand; the path, which no width fits, comes last.
+ScanWriter::ScanWriter(ScanForm form, bool color)
+    : form_(form),
+      color_(color),
+      table_({{"TEMPO", Align::right, 7},
+              {"BEATS", Align::right},
+              {"KEY", Align::left, 8},
+              {"SIGNATURE"},
+              {"CATEGORY", Align::left, 16},
+              {"GENRE", Align::left, 16},
+              {"FILE"}})
+{
+    if (form_ != ScanForm::csv)
+        return;
+    for (const char* column : kColumns)
+        output_.print("{}{}", column == kColumns[0] ? "" : ",", column);
+    output_.write("\r\n");
+}
+
+void ScanWriter::add(const ScanRecord& record)
+{
+    const bool first = std::exchange(first_, false);
+    if (form_ == ScanForm::table) {
+        if (first)
+            table_.printTitles(output_, color_);
+        table_.printRow(output_, record.cells);
+        return;
+    }
+    if (form_ == ScanForm::json)
+        output_.write(first ? "[\n" : ",\n");
+    output_.write(record.text);
+}
+
+void ScanWriter::finish()
+{
+    if (form_ == ScanForm::json)
+        output_.write(first_ ? "[]\n" : "\n]\n");
+}

@@ -1,0 +1,45 @@
+// One file of a scan: read by any thread and put into the form of the output, then written in order.
+#pragma once
+
+#include "tool/shared/output/Output.h"
+#include "tool/shared/output/Table.h"
+
+#include <string>
+#include <vector>
+
+enum class ScanForm { table, lines, json, csv, none };
+ScanForm scanForm(Form form);
+
+/// What the walk over the folders met; `problem` is why a folder could not be read, or empty.
+struct ScanItem {
+    std::string path;
+    std::string problem;
+};
+
+struct ScanRecord {
+    enum Kind { none, loop, bad };
+    Kind kind = none;
+    std::string path;
+    std::string text;               // of a loop the record, of a bad file what is wrong
+    std::vector<std::string> cells; // of a loop in a table
+};
+
+/// Reads one file. A loop is an AIFF or CAF file that has loop tags, transients or another loop chunk. Bad is what
+/// cannot be read, but of the files that hold no known audio, and of links to nothing, only those that are called so
+/// (".aif", ".aiff", ".caf"). Throws nothing.
+ScanRecord scanFile(const ScanItem& item, ScanForm form);
+
+/// Writes the records of the loops.
+class ScanWriter {
+public:
+    ScanWriter(ScanForm form, bool color);
+    void add(const ScanRecord& record);
+    void finish();
+
+private:
+    ScanForm form_;
+    bool color_;
+    bool first_ = true;
+    Table table_;
+    Output& output_ = Output::standard();
+};

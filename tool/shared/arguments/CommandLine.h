@@ -1,0 +1,69 @@
+// The grammar `ktfiles VERB [OBJECT] FILE… [options]`: parsing, help, exit statuses, and the list that verbs join.
+#pragma once
+
+#include "platform/core/FourCC.h"
+#include "tool/shared/edits/OutputFile.h"
+#include "tool/shared/edits/SafeEdit.h"
+#include "tool/shared/output/Output.h"
+
+#include <CLI/CLI.hpp>
+
+#include <functional>
+#include <map>
+#include <string>
+#include <vector>
+
+/// Exit statuses of the command.
+enum : int { kExitOK = 0, kExitFailed = 1, kExitUsage = 2 };
+
+/// Owns the parser, and the options that every verb takes.
+class CommandLine {
+public:
+    CommandLine();
+
+    /// A verb, or with `parent` an object of one. `run` does the work after parsing and tells whether all went well; it
+    /// may throw a CLI::ParseError for a combination of arguments that makes no sense.
+    CLI::App& addVerb(const std::string& name, const std::string& description, std::function<bool()> run,
+                      CLI::App* parent = nullptr);
+    const OutputOptions& output() const { return output_; }
+
+    // Arguments that verbs have in common. The values must outlive the parsing.
+    static CLI::Option* addFile(CLI::App& verb, std::string& file, const std::string& name = "FILE");
+    static CLI::Option* addFiles(CLI::App& verb, std::vector<std::string>& files, const std::string& name = "FILE");
+    /// Words that are another program's business; they come last.
+    static CLI::Option* addWords(CLI::App& verb, const std::string& name, std::vector<std::string>& words,
+                                 const std::string& description);
+    static CLI::Option* addChunkId(CLI::App& verb, FourCC& id);
+    /// An option whose value names a file; "-" stands for standard input or output.
+    static CLI::Option* addPath(CLI::App& verb, const std::string& name, std::string& path,
+                                const std::string& description);
+    /// "--force", of verbs that write files of the user's choice.
+    static void addForceOption(CLI::App& verb, OutputFile::Existing& existing);
+    static void addEditOptions(CLI::App& verb, EditOptions& options);
+
+    /// The exit status when the verb's work tells that not all went well, in the place of kExitFailed.
+    void setFailureStatus(int status) { failureStatus_ = status; }
+
+    /// Parses and does what is asked; the exit status of the process.
+    int run(int argc, char** argv);
+
+private:
+    void addOutputOptions(CLI::App& verb);
+    void addHelpVerb();
+    bool printHelp() const;
+    int parseAndRun(std::vector<std::string> arguments);
+
+    CLI::App app_;
+    OutputOptions output_;
+    int failureStatus_ = kExitFailed;
+    std::map<const CLI::App*, std::function<bool()>> work_;
+    std::vector<std::string> helpTopics_;
+};
+
+/// Joins the list of verbs from a file of their own: `const VerbRegistration registration{10, declareInfo};`
+class VerbRegistration {
+public:
+    /// `rank` orders the verbs in the help.
+    VerbRegistration(int rank, void (*declare)(CommandLine&));
+    static void declareAll(CommandLine& commandLine);
+};

@@ -1,0 +1,35 @@
+#include "tool/shared/arguments/CoordinationFolder.h"
+
+#include "platform/FileCoordination.h"
+
+#include <cstdlib>
+#include <filesystem>
+#include <string>
+#include <system_error>
+
+namespace {
+
+constexpr const char* kVariable = "KTFILES_COORDINATION";
+
+} // namespace
+
+void useCoordinationFolderOfEnvironment()
+{
+    if (const char* const folder = std::getenv(kVariable); folder != nullptr && *folder != '\0')
+        platform::FileCoordinator::setCoordinationFolder(folder);
+}
+
+void addCoordinationFolder(CLI::App& verb)
+{
+    verb.add_option_function<std::string>(
+            "--coordination",
+            [](const std::string& folder) {
+                std::error_code error; // of a working folder that is gone: the access then says what is wrong
+                const std::string absolute = std::filesystem::absolute(folder, error).string();
+                ::setenv(kVariable, absolute.c_str(), 1);
+                platform::FileCoordinator::setCoordinationFolder(error ? folder : absolute);
+            },
+            "The folder in which programs coordinate, the same for all")
+        ->option_text("FOLDER")
+        ->check(CLI::Validator([](std::string& text) { return text.empty() ? "a file name is missing" : ""; }, ""));
+}

@@ -1,0 +1,148 @@
+#include "tool/shared/edits/OutputFile.h"
+
+#include "tool/shared/edits/FileCopy.h"
+#include "tool/shared/output/Failure.h"
+#include "tool/shared/output/Progress.h"
+
+#include <algorithm>
+#include <cerrno>
+#include <fcntl.h>
+#include <filesystem>
+#include <unistd.h>
+
+namespace {
+
+[[noreturn]] void failToWrite(int error)
+{
+    throw Failure("the output cannot be written: " + systemErrorText(error));
+}
+
+[[noreturn]] void failSinceItExists(const std::string& out)
+{
+    throw Failure(out + " exists; --force replaces it");
+}
+
+void requireFolderOf(const std::string& out)
+{
+    const std::string folder = std::filesystem::path(out).parent_path().string();
+    struct stat found = {};
+    if (!folder.empty() && ::stat(folder.c_str(), &found) != 0)
+        throw Failure("the folder " + folder + ": " + systemErrorText(errno));
+}
+
+} // namespace
+
+OutputFile::OutputFile(const std::string& out, const std::string& source, Existing existing)
+    : out_(out),
+      target_(out),
+      existing_(existing)
+{
+    struct stat original = {}, found = {};
+    const bool exists = ::stat(out.c_str(), &found) == 0;
+    if (exists && S_ISDIR(found.st_mode))
+        throw Failure(out + " is a folder");
+    if (exists && ::stat(source.c_str(), &original) == 0 && original.st_dev == found.st_dev &&
+        original.st_ino == found.st_ino)
+        throw Failure("the output would be written over the file itself");
+    if (exists && !S_ISREG(found.st_mode)) {
+        device_ = Descriptor(::open(out.c_str(), O_WRONLY | O_NOCTTY | O_CLOEXEC));
+        if (!device_)
+            throw Failure(out + ": " + systemErrorText(errno));
+        return;
+    }
+    if (exists && existing == Existing::refuse)
+        failSinceItExists(out);
+    requireFolderOf(out);
+    if (exists)
+        target_ = replaced_ = std::filesystem::canonical(out).string();
+    if (exists && ::access(target_.c_str(), W_OK) != 0)
+        throw Failure(out + ": " + systemErrorText(errno));
+    const mode_t mask = ::umask(0);
+    ::umask(mask);
+    mode_ = 0666 & ~mask;
+    file_.emplace(target_);
+}
+
+void OutputFile::write(std::string_view bytes)
+{
+    while (!bytes.empty()) {
+        const ssize_t written = ::write(file_ ? file_->descriptor() : device_.get(), bytes.data(), bytes.size());
+        if (written < 0 && errno != EINTR)
+            failToWrite(errno);
+        bytes.remove_prefix(static_cast<std::size_t>(std::max<ssize_t>(written, 0)));
+    }
+}
+
+void OutputFile::rewrite(std::int64_t offset, std::string_view bytes)
+{
+    while (!bytes.empty()) {
+        const ssize_t written = ::pwrite(file_->descriptor(), bytes.data(), bytes.size(), offset);
+        if (written < 0 && errno != EINTR)
+            failToWrite(errno);
+        offset += std::max<ssize_t>(written, 0);
+        bytes.remove_prefix(static_cast<std::size_t>(std::max<ssize_t>(written, 0)));
+    }
+}
+
+void OutputFile::finish()
+{
+    if (!file_)
+        return;
+    if (::fchmod(file_->descriptor(), mode_) != 0)
+        throw Failure(systemErrorText(errno));
+    synchronize(file_->descriptor());
+    if (const Descriptor replaced = replaced_.empty() ? Descriptor() : openRegularFile(replaced_, O_RDWR))
+        takePlaceOf(replaced);
+    else if (existing_ == Existing::replace)
+        file_->replace();
+    else if (!file_->publish(target_)) // it came meanwhile
+        failSinceItExists(out_);
+    if (!file_->synchronizeFolder())
+        throw Failure("the output is written, but its folder cannot be committed to storage: " +
+                      systemErrorText(errno));
+}
+
+void OutputFile::takePlaceOf(const Descriptor& replaced)
+{
+    struct stat status = {};
+    if (::fstat(replaced.get(), &status) != 0)
+        failToWrite(errno);
+    if (status.st_nlink > 1)
+        return writeInto(replaced);
+    try {
+        copyAttributes(replaced.get(), status, file_->descriptor(), Times::now);
+    } catch (const Failure&) { // an owner that we cannot give it
+        return writeInto(replaced);
+    }
+    file_->replace();
+}
+
+// Room is made sure of while the old content is still there.
+void OutputFile::writeInto(const Descriptor& replaced)
+{
+    struct stat status = {};
+    if (::fstat(file_->descriptor(), &status) != 0)
+        failToWrite(errno);
+    if (::fallocate(replaced.get(), FALLOC_FL_KEEP_SIZE, 0, std::max<off_t>(status.st_size, 1)) != 0 && errno == ENOSPC)
+        failToWrite(errno);
+    if (::ftruncate(replaced.get(), 0) != 0)
+        failToWrite(errno);
+    Progress progress("writing", status.st_size, true);
+    copyContent(file_->descriptor(), replaced.get(), progress);
+    synchronize(replaced.get());
+}
+
+void requireFreeName(const std::string& out, OutputFile::Existing existing)
+{
+    struct stat found = {};
+    if (existing == OutputFile::Existing::refuse && ::stat(out.c_str(), &found) == 0 && S_ISREG(found.st_mode))
+        failSinceItExists(out);
+}
+
+void writeOutputFile(const std::string& out, const std::string& source, OutputFile::Existing existing,
+                     const std::function<void(const Sink&)>& produce)
+{
+    OutputFile file(out, source, existing);
+    produce([&](std::string_view bytes) { file.write(bytes); });
+    file.finish();
+}

@@ -1,0 +1,91 @@
+#include "tool/shared/input/FileFacts.h"
+
+#include "files/AudioFileNames.h"
+#include "files/CFileUtilDates.h"
+#include "tool/shared/input/InputFile.h"
+
+#include <array>
+#include <cmath>
+#include <ctime>
+#include <vector>
+
+#include <sys/stat.h>
+
+namespace {
+
+constexpr double kFrom1970To2001 = 978'307'200;
+
+template <class Convert>
+std::string formatted(const std::optional<platform::Date>& date, const char* format, Convert convert)
+{
+    std::tm parts = {};
+    std::array<char, 64> text;
+    if (!date)
+        return "";
+    const auto seconds = static_cast<std::time_t>(std::floor(date->secondsSince2001 + kFrom1970To2001));
+    const bool known = convert(&seconds, &parts) != nullptr;
+    return known ? std::string(text.data(), std::strftime(text.data(), text.size(), format, &parts)) : "";
+}
+
+bool isFile(const std::string& path)
+{
+    struct stat status = {};
+    return ::stat(path.c_str(), &status) == 0 && S_ISREG(status.st_mode);
+}
+
+/// The ways to spell a short text in upper and lower case, as it is given first.
+std::vector<std::string> spellings(const std::string& text)
+{
+    std::vector<std::string> all{text};
+    for (std::size_t at = 0; at < text.size(); ++at) {
+        const bool isUpper = text[at] >= 'A' && text[at] <= 'Z', isLower = text[at] >= 'a' && text[at] <= 'z';
+        if (!isUpper && !isLower)
+            continue;
+        for (std::size_t i = 0, count = all.size(); i < count; ++i) {
+            std::string other = all[i];
+            other[at] = static_cast<char>(text[at] ^ 'a' ^ 'A');
+            all.push_back(std::move(other));
+        }
+    }
+    return all;
+}
+
+} // namespace
+
+std::optional<StereoHalf> stereoHalf(const std::string& path)
+{
+    const std::size_t name = path.rfind('/') + 1;
+    const int index = CFileUtilHasStereoExtension(path.c_str() + name);
+    const int point = CFileUtilGetPointExt(path.c_str() + name);
+    if (index < 0)
+        return std::nullopt;
+    StereoHalf half;
+    half.isLeft = index % 2 == 0;
+    const std::string stem = path.substr(0, name + static_cast<std::size_t>(point));
+    const std::string suffix = CFileUtilGetStereoExtension(nullptr, index ^ 1);
+    half.partner = stem + suffix;
+    // Programs write names in capitals, small, or in between.
+    for (const std::string& candidate : spellings(suffix))
+        if (isFile(stem + candidate)) {
+            half.partner = stem + candidate;
+            half.partnerExists = true;
+            break;
+        }
+    return half;
+}
+
+FileFacts factsOf(const std::string& path)
+{
+    const CFileRef file = referenceTo(path);
+    return {CFileUtilFileType(file), stereoHalf(path), CFileUtilGetModificationDate(file)};
+}
+
+std::string dateText(const std::optional<platform::Date>& date)
+{
+    return formatted(date, "%Y-%m-%dT%H:%M:%SZ", ::gmtime_r);
+}
+
+std::string localDateText(const std::optional<platform::Date>& date)
+{
+    return formatted(date, "%Y-%m-%d %H:%M", ::localtime_r);
+}

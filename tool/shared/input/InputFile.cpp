@@ -1,0 +1,62 @@
+#include "tool/shared/input/InputFile.h"
+
+#include "platform/core/Status.h"
+#include "tool/shared/output/Failure.h"
+
+#include <cerrno>
+#include <filesystem>
+#include <sys/stat.h>
+
+void requireRegularFile(const std::string& path)
+{
+    struct stat status = {};
+    if (::stat(path.c_str(), &status) != 0)
+        throw Failure(systemErrorText(errno));
+    if (S_ISDIR(status.st_mode))
+        throw Failure("is a folder");
+    if (!S_ISREG(status.st_mode))
+        throw Failure(S_ISFIFO(status.st_mode)   ? "is a FIFO, not a regular file"
+                      : S_ISSOCK(status.st_mode) ? "is a socket, not a regular file"
+                                                 : "is a device, not a regular file");
+}
+
+CFileRef referenceTo(const std::string& path)
+{
+    requireRegularFile(path);
+    // Absolute, since the library expands a "~" at the start of a path, which the shell has done already.
+    std::error_code error;
+    const std::filesystem::path absolute = std::filesystem::absolute(path, error);
+    if (error)
+        throw Failure(systemErrorText(error.value()));
+    if (platform::String::fromFileSystemRepresentation(absolute.c_str()).isNull())
+        throw Failure("its path is not valid UTF-8");
+    CFileRef reference(absolute.c_str(), false);
+    if (!reference.IsValid())
+        throw Failure("its path cannot be a file URL");
+    return reference;
+}
+
+void openAudio(CAudioFileIO& file, const std::string& path)
+{
+    requireOK(file.Open(referenceTo(path), 0));
+    if (file.GetEOF() == 0)
+        throw Failure("is empty");
+    if (file.Info().fileType == 0)
+        throw Failure("no audio file known here");
+}
+
+void requireDecoder(CAudioFileIO& file)
+{
+    platform::Error error;
+    if (const std::int32_t status = file.OpenDecoder(&error); status != kStatusOK)
+        throw Failure(error.code == status ? error.description : StatusText(status));
+}
+
+void openContainer(CAudioFileIO& file, const std::string& path, unsigned int mode)
+{
+    requireOK(file.Open(referenceTo(path), mode));
+    if (file.GetEOF() == 0)
+        throw Failure("is empty");
+    if (file.Info().fileType != kCaff && file.IsChunkBased() == 0)
+        throw Failure("no container known here (RIFF, RF64, BW64, AIFF, AIFC, REX2, CAF)");
+}

@@ -1,0 +1,77 @@
+// The loop tags of one AIFF or CAF file, as the verbs show, compare and change them.
+#pragma once
+
+#include "loops/VireoLoopChunksManager.h"
+#include "platform/core/Value.h"
+#include "tool/shared/output/Failure.h"
+
+#include <nlohmann/json_fwd.hpp>
+
+#include <cstdint>
+#include <string>
+#include <string_view>
+#include <vector>
+
+/// Plain values; nothing of the file stays open.
+struct LoopTags {
+    /// A chunk that is carried without being interpreted. `size` is that of its body, without a UUID.
+    struct Chunk {
+        std::string id; // the AIFF id in either kind of file; "silence" for the chunk that has none
+        std::uint32_t size = 0;
+    };
+
+    FourCC fileType = 0; // "AIFF" or "caff"
+    double sampleRate = 0;
+    std::uint64_t frames = 0;
+    platform::Dictionary combined; // under the VireoLoopCombinedTagsChunkData keys
+    platform::Dictionary info;     // under the VireoLoopFileInfoChunkData keys
+    std::vector<VireoLoopTransient> transients;
+    std::vector<Chunk> chunks;
+
+    /// The number or text under a key of either dictionary; 0 or "" when there is none.
+    std::int64_t number(std::string_view key) const;
+    std::string text(std::string_view key) const;
+    /// Beats per minute; 0 when beats, frames or rate are not known.
+    double tempo() const;
+    /// Whether any chunk of a loop is there; texts such as a title, which any file may have, do not make one.
+    bool isLoop() const { return !combined.empty() || !transients.empty() || !chunks.empty(); }
+};
+
+/// The Failure of a file that is whole, perhaps, but of a kind without loop tags.
+class NoLoopContainer : public Failure {
+public:
+    /// `isKnown` for an audio file of another kind; else it may be anything.
+    NoLoopContainer(const std::string& text, bool isKnown) : Failure(text), isKnown_(isKnown) {}
+    bool isKnown() const { return isKnown_; }
+
+private:
+    bool isKnown_;
+};
+
+/// Opens a file that can hold loop tags; throws Failure, also for a WAVE or AIFC file.
+VireoLoopChunksManager openLoopFile(const std::string& path, platform::AudioFile::Permission permission);
+
+/// Reads them, and of the chunks that are not interpreted only the sizes. Throws Failure.
+LoopTags readLoopTags(const std::string& path);
+
+/// The chunks of an open file that hold loop tags or are carried, whether they can be read or not.
+std::vector<LoopTags::Chunk> loopChunksOf(VireoLoopChunksManager& manager);
+
+/// One tag in words: its name on the command line, its label for people, and the value.
+struct TagLine {
+    const char* name;
+    const char* label;
+    std::string text;
+};
+/// What is known of the tags, in a musician's order; texts are as in the file.
+std::vector<TagLine> tagLines(const LoopTags& tags);
+/// The text of one tag by its name, which must be one of theirs.
+std::string tagText(const LoopTags& tags, const char* name);
+
+/// "AIFF" or "CAF".
+const char* loopContainerName(FourCC fileType);
+
+/// The JSON members of all tags that are present, without the transients, of which there may be millions.
+nlohmann::ordered_json tagsWithoutTransients(const LoopTags& tags);
+/// The whole JSON object, on one line.
+std::string loopTagsJson(const std::string& path, const LoopTags& tags);

@@ -1,0 +1,27 @@
+// All that makes a loop, carried from one file to another, AIFF and CAF in either direction.
+#pragma once
+
+#include "loops/VireoLoopChunks.h"
+#include "tool/shared/looptags/LoopTags.h"
+#include "tool/shared/looptags/LoopTagsEdit.h"
+
+#include <memory>
+#include <string>
+
+/// The loop of the file that is copied from, in whole.
+struct LoopSource {
+    LoopTags tags;
+    RawLoopTags bytes;
+    VireoLoopChunkList chunks = VireoLoopChunks::Empty();
+
+    bool isEmpty() const { return !tags.isLoop() && tags.info.empty(); }
+};
+
+/// Throws Failure.
+std::shared_ptr<LoopSource> readLoopSource(const std::string& path);
+
+/// What of it changes in the file `target`, whose tags are `before`: each takes the place of what is there, what the
+/// source does not have stays. What the target has no room for, or what cannot be read between two kinds of file, is
+/// told and costs nothing else. Throws Failure.
+TagsPlan planTagsCopy(const std::shared_ptr<const LoopSource>& source, const LoopTags& before,
+                      const std::string& target);

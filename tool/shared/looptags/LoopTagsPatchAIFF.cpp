@@ -1,0 +1,269 @@
+// The AIFF side of LoopTagsPatch.
+#include "loops/VireoLoopCombinedTagsChunkDataTypes.h"
+#include "loops/VireoLoopFileInfoChunkDataTypes.h"
+#include "loops/tagging/Chunks.h"
+#include "tool/shared/looptags/LoopTagsLayouts.h"
+#include "tool/shared/output/Failure.h"
+
+#include <fmt/format.h>
+
+#include <cstring>
+#include <set>
+
+using platform::Value;
+using tagging::BasicTaggingChunk;
+using tagging::CategoryChunk;
+using tagging::kCategoryTextSize;
+
+namespace {
+
+constexpr std::string_view kBeatCount = VireoLoopCombinedTagsChunkDataBeatCountKey;
+constexpr std::string_view kRootNote = VireoLoopCombinedTagsChunkDataMidiRootNoteKey;
+constexpr std::string_view kKeyType = VireoLoopCombinedTagsChunkDataKeyType;
+constexpr std::string_view kTop = VireoLoopCombinedTagsChunkDataSignatureTopKey;
+constexpr std::string_view kBottom = VireoLoopCombinedTagsChunkDataSignatureBottomKey;
+
+bool isZeroFrom(BytesView bytes, std::size_t start)
+{
+    return std::ranges::all_of(bytes.subspan(std::min(start, bytes.size())),
+                               [](std::byte b) { return b == std::byte{}; });
+}
+
+// A new chunk of version 1.
+Bytes newChunk(std::size_t size)
+{
+    Bytes bytes(size);
+    storeBE(bytes.data(), std::uint32_t{1});
+    return bytes;
+}
+
+// AIFF "basc".
+
+std::size_t offsetInBasic(std::string_view key)
+{
+    return key == kRootNote  ? offsetof(BasicTaggingChunk, midiRootNote)
+           : key == kKeyType ? offsetof(BasicTaggingChunk, keyType)
+           : key == kTop     ? offsetof(BasicTaggingChunk, signatureTop)
+           : key == kBottom  ? offsetof(BasicTaggingChunk, signatureBottom)
+                             : offsetof(BasicTaggingChunk, fileType);
+}
+
+void assignBasic(std::optional<Bytes>& chunk, std::string_view key, std::int64_t number)
+{
+    if (!chunk && number == 0)
+        return;
+    Bytes bytes = chunk ? *chunk : newChunk(sizeof(BasicTaggingChunk));
+    if (bytes.size() < sizeof(BasicTaggingChunk))
+        throw Failure(fmt::format("its chunk \"basc\" is cut short ({} of {} bytes); tags remove takes it off",
+                                  bytes.size(), sizeof(BasicTaggingChunk)));
+    if (key == kBeatCount)
+        storeBE(bytes.data() + offsetof(BasicTaggingChunk, beatCount), static_cast<std::int32_t>(number));
+    else
+        storeBE(bytes.data() + offsetInBasic(key), static_cast<std::int16_t>(number));
+    if (bytes == chunk)
+        return;
+    chunk = std::move(bytes);
+    if (isZeroFrom(*chunk, offsetof(BasicTaggingChunk, beatCount)))
+        chunk.reset();
+}
+
+// AIFF "cate".
+
+struct CategoryLayout {
+    std::size_t countOffset;
+    std::size_t descriptorsOffset;
+};
+
+std::optional<CategoryLayout> layoutOf(BytesView chunk)
+{
+    if (chunk.size() < sizeof(CategoryChunk))
+        return std::nullopt;
+    switch (loadBE<std::uint32_t>(chunk.data())) {
+    case 1:
+        return CategoryLayout{offsetof(CategoryChunk, descriptorCount), sizeof(CategoryChunk)};
+    case 2:
+        return CategoryLayout{tagging::kCategoryV2CountOffset, tagging::kCategoryV2DescriptorsOffset};
+    default:
+        return std::nullopt;
+    }
+}
+
+std::size_t offsetInCategories(std::string_view key)
+{
+    return key == VireoLoopCombinedTagsChunkDataInstrumentTypeKey      ? offsetof(CategoryChunk, instrumentType)
+           : key == VireoLoopCombinedTagsChunkDataInstrumentSubTypeKey ? offsetof(CategoryChunk, instrumentSubType)
+                                                                       : offsetof(CategoryChunk, genre);
+}
+
+std::string_view fieldText(BytesView field)
+{
+    const std::string_view text = textOf(field);
+    return text.substr(0, text.find('\0'));
+}
+
+void storeField(std::byte* field, std::string_view text)
+{
+    std::memset(field, 0, kCategoryTextSize);
+    std::memcpy(field, text.data(), std::min(text.size(), kCategoryTextSize - 1));
+}
+
+// The fields of the descriptors, and where what lies behind them begins.
+struct DescriptorFields {
+    std::vector<std::string> texts;
+    std::size_t end;
+};
+
+DescriptorFields descriptorFields(BytesView chunk, const CategoryLayout& layout)
+{
+    if (chunk.size() < layout.descriptorsOffset)
+        return {{}, chunk.size()};
+    const std::size_t claimed = loadBE<std::uint16_t>(chunk.data() + layout.countOffset);
+    const std::size_t room = (chunk.size() - layout.descriptorsOffset) / kCategoryTextSize;
+    DescriptorFields fields{{}, layout.descriptorsOffset + claimed * kCategoryTextSize};
+    for (std::size_t i = 0; i < std::min(claimed, room); ++i)
+        fields.texts.emplace_back(
+            fieldText(chunk.subspan(layout.descriptorsOffset + i * kCategoryTextSize, kCategoryTextSize)));
+    fields.end = std::min(fields.end, chunk.size());
+    return fields;
+}
+
+void assignDescriptors(Bytes& chunk, const CategoryLayout& layout, const std::vector<std::string>& texts)
+{
+    const DescriptorFields old = descriptorFields(chunk, layout);
+    if (std::set<std::string>(old.texts.begin(), old.texts.end()) == std::set<std::string>(texts.begin(), texts.end()))
+        return;
+    const std::size_t count = std::min<std::size_t>(texts.size(), UINT16_MAX);
+    Bytes bytes(chunk.begin(), chunk.begin() + std::min(std::ssize(chunk), std::ptrdiff_t(layout.descriptorsOffset)));
+    bytes.resize(layout.descriptorsOffset + count * kCategoryTextSize);
+    storeBE(bytes.data() + layout.countOffset, static_cast<std::uint16_t>(count));
+    for (std::size_t i = 0; i < count; ++i)
+        storeField(bytes.data() + layout.descriptorsOffset + i * kCategoryTextSize, texts[i]);
+    bytes.insert(bytes.end(), chunk.begin() + static_cast<std::ptrdiff_t>(old.end), chunk.end());
+    chunk = std::move(bytes);
+}
+
+void assignCategory(std::optional<Bytes>& chunk, const TagField& field, const Value& value)
+{
+    const bool isList = field.kind == TagField::Kind::list;
+    if (!chunk && (isList ? assignedTexts(value).empty() : assignedText(value).empty()))
+        return;
+    Bytes bytes = chunk ? *chunk : newChunk(sizeof(CategoryChunk));
+    const auto layout = layoutOf(bytes);
+    if (!layout && bytes.size() < sizeof(CategoryChunk))
+        throw Failure(fmt::format("its chunk \"cate\" is cut short ({} of {} bytes); tags remove takes it off",
+                                  bytes.size(), sizeof(CategoryChunk)));
+    if (!layout)
+        throw Failure(fmt::format("its chunk \"cate\" is of version {}, whose layout is not known",
+                                  loadBE<std::uint32_t>(bytes.data())));
+    if (isList) {
+        assignDescriptors(bytes, *layout, assignedTexts(value));
+    } else {
+        const std::size_t offset = offsetInCategories(field.key);
+        if (fieldText(BytesView(bytes).subspan(offset, kCategoryTextSize)) != assignedText(value))
+            storeField(bytes.data() + offset, assignedText(value));
+    }
+    if (bytes == chunk)
+        return;
+    chunk = std::move(bytes);
+    if (isZeroFrom(*chunk, offsetof(CategoryChunk, instrumentType)))
+        chunk.reset();
+}
+
+// AIFF "COMT": a count, then for each comment a time stamp (4 bytes), a marker (2), the text's size (2) and the text,
+// which a further comment follows at an even place.
+
+constexpr std::size_t kCommentSizeAt = 8;
+constexpr std::size_t kCommentTextAt = 10;
+
+struct FirstComment {
+    std::string_view text; // as it stands
+    std::size_t next;      // where what lies behind it begins
+};
+
+std::optional<FirstComment> firstComment(BytesView chunk)
+{
+    if (chunk.size() < kCommentTextAt || loadBE<std::uint16_t>(chunk.data()) == 0)
+        return std::nullopt;
+    const std::size_t size = loadBE<std::uint16_t>(chunk.data() + kCommentSizeAt);
+    return FirstComment{textOf(chunk).substr(kCommentTextAt, size),
+                        std::min(kCommentTextAt + size + (size & 1), chunk.size())};
+}
+
+// None when no comment is left.
+std::optional<Bytes> assignedComment(const std::optional<Bytes>& chunk, const std::string& text)
+{
+    using Types = VireoLoopFileInfoChunkDataTypes;
+    const auto old = chunk ? firstComment(*chunk) : std::nullopt;
+    if (old && !text.empty() && Types::commentStringFromAifCommentChunkData(*chunk) == text)
+        return chunk;
+    const bool isAlone = !old || (loadBE<std::uint16_t>(chunk->data()) == 1 && isZeroFrom(*chunk, old->next));
+    if (text.empty() && isAlone)
+        return std::nullopt;
+    Bytes bytes = Types::commentDataFromAifCommentChunkStrings(text);
+    if (!old)
+        return bytes;
+    if (!isAlone) {
+        const std::size_t size = text.empty() ? 0 : loadBE<std::uint16_t>(bytes.data() + kCommentSizeAt);
+        storeBE(bytes.data() + kCommentSizeAt, static_cast<std::uint16_t>(size));
+        bytes.resize(kCommentTextAt + size + (size & 1)); // a zero byte of those behind the text is the pad byte
+        bytes.insert(bytes.end(), chunk->begin() + static_cast<std::ptrdiff_t>(old->next), chunk->end());
+    }
+    std::copy_n(chunk->begin(), kCommentSizeAt, bytes.begin()); // count, time stamp and marker
+    return bytes;
+}
+
+void assignAIFFText(std::map<FourCC, Bytes>& texts, const TagField& field, const std::string& text)
+{
+    const FourCC id = VireoLoopFileInfoChunkDataTypes::fileInfoTypeForKey(field.key);
+    const auto found = texts.find(id);
+    const auto old = found == texts.end() ? std::nullopt : std::optional(found->second);
+    std::optional<Bytes> bytes;
+    if (field.key == std::string_view(VireoLoopFileInfoChunkDataCommentsKey))
+        bytes = assignedComment(old, text);
+    else if (!text.empty() && old && fieldText(*old) == text)
+        bytes = old;
+    else if (!text.empty())
+        bytes.emplace(bytesOf(text).begin(), bytesOf(text).end());
+    if (bytes)
+        texts[id] = std::move(*bytes);
+    else
+        texts.erase(id);
+}
+
+} // namespace
+
+void assignAIFFTags(RawLoopTags& tags, std::span<const TagAssignment> assignments)
+{
+    for (const auto& [field, value] : assignments)
+        if (field->isFileInfo)
+            assignAIFFText(tags.texts, *field, assignedText(value));
+        else if (field->kind == TagField::Kind::number)
+            assignBasic(tags.basic, field->key, assignedNumber(value));
+        else if (field->kind != TagField::Kind::transients)
+            assignCategory(tags.categories, *field, value);
+}
+
+std::optional<std::string> rawAIFFText(const RawLoopTags& tags, const TagField& field)
+{
+    std::string_view text;
+    const auto found = tags.texts.find(VireoLoopFileInfoChunkDataTypes::fileInfoTypeForKey(field.key));
+    if (!field.isFileInfo && tags.categories && layoutOf(*tags.categories)) {
+        text = fieldText(BytesView(*tags.categories).subspan(offsetInCategories(field.key), kCategoryTextSize));
+    } else if (field.isFileInfo && found != tags.texts.end()) {
+        const bool isComment = field.key == std::string_view(VireoLoopFileInfoChunkDataCommentsKey);
+        const auto comment = isComment ? firstComment(found->second) : std::nullopt;
+        text = comment ? comment->text : isComment ? std::string_view() : fieldText(found->second);
+    }
+    return text.empty() ? std::nullopt : std::optional(std::string(text));
+}
+
+std::vector<std::string> rawAIFFDescriptors(const RawLoopTags& tags)
+{
+    const auto layout = tags.categories ? layoutOf(*tags.categories) : std::nullopt;
+    return layout ? descriptorFields(*tags.categories, *layout).texts : std::vector<std::string>();
+}
+
+bool hasUnknownCategories(const RawLoopTags& tags)
+{
+    return tags.categories && !layoutOf(*tags.categories);
+}

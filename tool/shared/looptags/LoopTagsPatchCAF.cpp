@@ -1,0 +1,153 @@
+// The CAF side of LoopTagsPatch.
+#include "audiofile/ContainerHeaders.h"
+#include "loops/VireoLoopCombinedTagsChunkDataTypes.h"
+#include "tool/shared/looptags/CAFTextPairs.h"
+#include "tool/shared/looptags/LoopTagsLayouts.h"
+
+#include <fmt/format.h>
+
+using platform::Value;
+
+namespace {
+
+constexpr FourCC kInfo = fourCC("info");
+constexpr std::string_view kBeatCount = VireoLoopCombinedTagsChunkDataBeatCountKey;
+constexpr std::string_view kRootNote = VireoLoopCombinedTagsChunkDataMidiRootNoteKey;
+constexpr std::string_view kKeyType = VireoLoopCombinedTagsChunkDataKeyType;
+constexpr std::string_view kTop = VireoLoopCombinedTagsChunkDataSignatureTopKey;
+constexpr std::string_view kBottom = VireoLoopCombinedTagsChunkDataSignatureBottomKey;
+constexpr std::string_view kDescriptors = VireoLoopCombinedTagsChunkDataDescriptorsKey;
+
+// The pair that holds the field; both parts of a signature are in one. Null for the file type, which none holds.
+const char* cafKeyOf(const TagField& field)
+{
+    static constexpr std::pair<std::string_view, const char*> keys[] = {
+        {kBeatCount, "beat count"},
+        {kTop, "time signature"},
+        {kBottom, "time signature"},
+        {kRootNote, "key signature"},
+        {kKeyType, "key type"},
+        {VireoLoopCombinedTagsChunkDataInstrumentTypeKey, "category"},
+        {VireoLoopCombinedTagsChunkDataInstrumentSubTypeKey, "subcategory"},
+        {VireoLoopCombinedTagsChunkDataGenreKey, "genre"},
+        {kDescriptors, "descriptors"},
+    };
+    if (field.isFileInfo)
+        return field.name; // the names are those of the pairs
+    for (const auto& [key, name] : keys)
+        if (field.key != nullptr && key == field.key)
+            return name;
+    return nullptr;
+}
+
+// The text that stands for a value; empty when none does.
+std::string cafText(const TagField& field, const Value& value)
+{
+    constexpr std::int64_t lowestNote = 48, highestNote = 59, lastKeyType = 4;
+    const std::int64_t number = assignedNumber(value);
+    if (field.kind == TagField::Kind::text)
+        return assignedText(value);
+    if (field.kind == TagField::Kind::list)
+        return fmt::format("{}", fmt::join(assignedTexts(value), ","));
+    if (field.key == kBeatCount)
+        return number > 0 ? std::to_string(number) : "";
+    if (field.key == kRootNote)
+        return number >= lowestNote && number <= highestNote ? noteName(number) : "";
+    return number > 0 && number <= lastKeyType ? modeName(number) : "";
+}
+
+// Nothing changes where the library reads what is asked for already; a text is compared as it stands.
+void assignPair(CAFTextPairs& pairs, const platform::Dictionary& read, const TagField& field, const Value& value)
+{
+    const std::string text = cafText(field, value);
+    const auto there = read.find(field.key);
+    const bool isText = field.kind == TagField::Kind::text;
+    if (text.empty())
+        pairs.erase(cafKeyOf(field));
+    else if (isText || there == read.end() || there->second != value)
+        pairs.set(cafKeyOf(field), text);
+}
+
+void assignSignature(CAFTextPairs& pairs, const platform::Dictionary& read, std::span<const TagAssignment> assignments)
+{
+    std::int64_t parts[] = {0, 0};
+    const std::string_view keys[] = {kTop, kBottom};
+    bool isNamed = false, differs = false;
+    for (std::size_t i = 0; i < 2; ++i) {
+        const auto* there = platform::find<std::int64_t>(read, keys[i]);
+        parts[i] = there != nullptr ? *there : 0;
+        for (const TagAssignment& assignment : assignments)
+            if (assignment.field->key != nullptr && assignment.field->key == keys[i]) {
+                isNamed = true;
+                differs = differs || assignedNumber(assignment.value) != parts[i];
+                parts[i] = assignedNumber(assignment.value);
+            }
+    }
+    if (isNamed && (parts[0] < 1 || parts[1] < 1))
+        pairs.erase("time signature");
+    else if (differs)
+        pairs.set("time signature", fmt::format("{}/{}", parts[0], parts[1]));
+}
+
+CAFTextPairs pairsOf(const std::optional<Bytes>& payload)
+{
+    return payload ? CAFTextPairs(*payload) : CAFTextPairs();
+}
+
+std::optional<Bytes> infoOf(const RawLoopTags& tags)
+{
+    const auto found = tags.texts.find(kInfo);
+    return found == tags.texts.end() ? std::nullopt : std::optional(found->second);
+}
+
+CAFTextPairs pairsWith(const RawLoopTags& tags, const TagField& field)
+{
+    return pairsOf(field.isFileInfo ? infoOf(tags) : tags.basic);
+}
+
+void storePairs(RawLoopTags& tags, bool isFileInfo, const CAFTextPairs& pairs)
+{
+    if (pairs.isEmpty() && isFileInfo)
+        tags.texts.erase(kInfo);
+    else if (pairs.isEmpty())
+        tags.basic.reset();
+    else
+        (isFileInfo ? tags.texts[kInfo] : tags.basic.emplace()) = pairs.payload();
+}
+
+} // namespace
+
+void assignCAFTags(RawLoopTags& tags, std::span<const TagAssignment> assignments)
+{
+    const platform::Dictionary read = combinedTagsOf(tags);
+    CAFTextPairs basic = pairsOf(tags.basic), info = pairsOf(infoOf(tags));
+    const CAFTextPairs basicBefore = basic, infoBefore = info;
+    assignSignature(basic, read, assignments);
+    for (const auto& [field, value] : assignments)
+        if (cafKeyOf(*field) != nullptr && field->key != kTop && field->key != kBottom)
+            assignPair(field->isFileInfo ? info : basic, read, *field, value);
+    if (basic != basicBefore)
+        storePairs(tags, false, basic);
+    if (info != infoBefore)
+        storePairs(tags, true, info);
+}
+
+std::optional<std::string> pairText(const RawLoopTags& tags, const TagField& field)
+{
+    const char* const key = tags.fileType != kAIFF ? cafKeyOf(field) : nullptr;
+    const CAFTextPairs pairs = key != nullptr ? pairsWith(tags, field) : CAFTextPairs();
+    const std::string* text = key != nullptr ? pairs.find(key) : nullptr;
+    return text != nullptr && !text->empty() ? std::optional(*text) : std::nullopt;
+}
+
+bool copyPair(RawLoopTags& to, const RawLoopTags& from, const TagField& field)
+{
+    const auto text = pairText(from, field);
+    if (!text)
+        return false;
+    CAFTextPairs pairs = pairsWith(to, field);
+    pairs.set(cafKeyOf(field), *text);
+    if (pairs != pairsWith(to, field))
+        storePairs(to, field.isFileInfo, pairs);
+    return true;
+}

@@ -1,0 +1,192 @@
+#include "tool/shared/looptags/TagsCarrier.h"
+
+#include "audiofile/ContainerHeaders.h"
+#include "loops/VireoLoopFileInfoChunkDataTypes.h"
+#include "platform/String.h"
+#include "tool/shared/looptags/LoopTagsEdit.h"
+#include "tool/shared/output/Failure.h"
+
+#include <fmt/format.h>
+
+#include <algorithm>
+#include <limits>
+
+using platform::Value;
+
+namespace {
+
+const char* const kNoText = " (it is no UTF-8 text)";
+
+Value valueUnder(const platform::Dictionary& values, const char* key)
+{
+    const auto found = values.find(key);
+    return found == values.end() ? Value() : found->second;
+}
+
+std::string cut(const std::string& text)
+{
+    constexpr std::size_t most = 60;
+    return text.size() > most ? text.substr(0, most) + "..." : text;
+}
+
+bool isBlank(const std::string& text)
+{
+    return text.find_first_not_of(std::string_view(" \t\r\n\v\f\0", 7)) == std::string::npos;
+}
+
+} // namespace
+
+TagsCarrier::TagsCarrier(const LoopTags& tags, const RawLoopTags& from, RawLoopTags& to,
+                         std::vector<std::string>& notKept)
+    : tags_(tags),
+      from_(from),
+      to_(to),
+      notKept_(notKept),
+      isSameKind_(from.fileType == to.fileType)
+{
+}
+
+void TagsCarrier::carry()
+{
+    if (hasUnknownCategories(from_) && isSameKind_ && !to_.categories)
+        to_.categories = from_.categories;
+    else if (hasUnknownCategories(from_) && from_.categories != to_.categories)
+        notKept_.emplace_back("the chunk \"cate\" is not kept: its layout is not known");
+    for (const TagField& field : tagFields()) {
+        const std::string_view name = field.name;
+        if (name == "signatureTop")
+            carryNumbers(fieldsForKey("signature"));
+        else if (field.kind == TagField::Kind::number && name != "signatureBottom")
+            carryNumbers({&field});
+        else if (field.kind == TagField::Kind::list)
+            carryDescriptors(field);
+        else if (field.kind == TagField::Kind::text)
+            carryText(field);
+    }
+}
+
+void TagsCarrier::carryNumbers(const std::vector<const TagField*>& fields)
+{
+    if (isSameKind_ && copyPair(to_, from_, *fields.front()))
+        return;
+    std::vector<TagAssignment> assignments;
+    std::string words;
+    bool isThere = false;
+    for (const TagField* field : fields) {
+        const std::int64_t number = tags_.number(field->key);
+        assignments.push_back({field, {}});
+        assignments.back().value = number;
+        words += (words.empty() ? "" : "/") + std::to_string(number);
+        isThere = isThere || number != 0;
+    }
+    if (!isThere)
+        return;
+    const std::string name = fields.size() == 1 ? fields.front()->name : "signature";
+    if (name == "loopFileType") {
+        // A CAF file neither keeps it nor has one: what it is follows from the other tags.
+        const bool isKnown = !isAbsent(valueUnder(combinedTagsOf(to_), fields.front()->key));
+        if (to_.fileType == kAIFF && (isSameKind_ || tags_.number(fields.front()->key) == 1 || !isKnown))
+            assign(assignments, true);
+        return;
+    }
+    const auto text = pairText(from_, *fields.front());
+    const bool isCut =
+        name == "beatCount" && text && words == std::to_string(std::numeric_limits<int>::max()) && *text != words;
+    if (isCut)
+        lose(name, *text, " (it has more than 32 bits)");
+    else if (!assign(assignments, true))
+        lose(name, words, why_);
+}
+
+void TagsCarrier::carryText(const TagField& field)
+{
+    const bool isComments = field.key == std::string_view(VireoLoopFileInfoChunkDataCommentsKey);
+    const auto raw = rawText(from_, field);
+    if (!raw || (isComments && isBlank(*raw)))
+        return;
+    std::string text = tags_.text(field.key);
+    if (text.empty() && !isSameKind_)
+        return lose(field.name, *raw, kNoText);
+    if (isSameKind_ && (text.empty() || !isComments)) {
+        if (const TagAssignment assignment{&field, *raw}; !assign({&assignment, 1}, false))
+            lose(field.name, *raw, why_);
+        return;
+    }
+    if (isComments && to_.fileType == kAIFF) {
+        using Types = VireoLoopFileInfoChunkDataTypes;
+        const auto kept =
+            Types::commentStringFromAifCommentChunkData(Types::commentDataFromAifCommentChunkStrings(text));
+        const std::size_t start = kept && !kept->empty() ? text.find(*kept) : 0;
+        if (kept && *kept != text && isBlank(text.substr(0, start)) && isBlank(text.substr(start + kept->size()))) {
+            text = *kept;
+            notKept_.push_back(fmt::format("the white space around {} is not kept", field.name));
+        }
+    }
+    if (const TagAssignment assignment{&field, text}; !assign({&assignment, 1}, true))
+        lose(field.name, text, text.find('\0') != std::string::npos ? " (it holds a NUL)" : why_);
+    else if (!isComments && platform::String::fromUTF8(*raw) && *raw != text)
+        notKept_.push_back(fmt::format("{} {} is kept as {}", field.name, cut(*raw), cut(text)));
+}
+
+void TagsCarrier::carryDescriptors(const TagField& field)
+{
+    if (isSameKind_ && copyPair(to_, from_, field))
+        return;
+    const std::vector<std::string> raw = rawDescriptors(from_);
+    platform::Array kept;
+    if (isSameKind_) {
+        kept.assign(raw.begin(), raw.end());
+    } else {
+        for (const std::string& each : raw)
+            if (!platform::String::fromUTF8(each))
+                lose(field.name, each, kNoText);
+        const Value read = valueUnder(tags_.combined, field.key);
+        const auto* list = read.get<platform::Array>();
+        for (const Value& value : list != nullptr ? *list : platform::Array()) {
+            const std::string& each = *value.get<std::string>();
+            if (isKept(field, each))
+                kept.push_back(each);
+            else if (!each.empty())
+                lose(field.name, each);
+        }
+    }
+    const std::size_t count = kept.size();
+    if (const TagAssignment assignment{&field, std::move(kept)}; count > 0 && !assign({&assignment, 1}, !isSameKind_))
+        lose(field.name, std::to_string(count), why_);
+}
+
+// Whether a file of the kind gives it back, were it the only one.
+bool TagsCarrier::isKept(const TagField& field, const std::string& descriptor) const
+{
+    RawLoopTags alone;
+    alone.fileType = to_.fileType;
+    const TagAssignment assignment{&field, platform::Array(1, descriptor)};
+    assignTags(alone, {&assignment, 1});
+    return valueUnder(combinedTagsOf(alone), field.key) == assignment.value;
+}
+
+// False when there is no room for it; then all is as before.
+bool TagsCarrier::assign(std::span<const TagAssignment> assignments, bool mustBeRead)
+{
+    RawLoopTags bytes = to_;
+    why_.clear();
+    try {
+        assignTags(bytes, assignments);
+    } catch (const Failure& failure) {
+        why_ = fmt::format(" ({})", failure.what());
+        return false;
+    }
+    if (mustBeRead) {
+        const platform::Dictionary combined = combinedTagsOf(bytes), info = infoTextsOf(bytes);
+        for (const auto& [field, value] : assignments)
+            if (valueUnder(field->isFileInfo ? info : combined, field->key) != value)
+                return false;
+    }
+    to_ = std::move(bytes);
+    return true;
+}
+
+void TagsCarrier::lose(const std::string& name, const std::string& value, const std::string& why)
+{
+    notKept_.push_back(fmt::format("{} {} is not kept{}", name, cut(value), why));
+}

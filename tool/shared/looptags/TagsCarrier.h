@@ -1,0 +1,33 @@
+// Tags and texts of one file put into the chunks of another: as they stand between files of one kind, by what they say
+// between AIFF and CAF.
+#pragma once
+
+#include "tool/shared/looptags/LoopTags.h"
+#include "tool/shared/looptags/LoopTagsPatch.h"
+
+#include <string>
+#include <vector>
+
+/// Each field for itself: one that cannot be kept is told, and costs nothing but itself.
+class TagsCarrier {
+public:
+    /// `tags` and `from` are of the same file.
+    TagsCarrier(const LoopTags& tags, const RawLoopTags& from, RawLoopTags& to, std::vector<std::string>& notKept);
+
+    void carry();
+
+private:
+    void carryNumbers(const std::vector<const TagField*>& fields);
+    void carryText(const TagField& field);
+    void carryDescriptors(const TagField& field);
+    bool assign(std::span<const TagAssignment> assignments, bool mustBeRead);
+    bool isKept(const TagField& field, const std::string& descriptor) const;
+    void lose(const std::string& name, const std::string& value, const std::string& why = {});
+
+    const LoopTags& tags_;
+    const RawLoopTags& from_;
+    RawLoopTags& to_;
+    std::vector<std::string>& notKept_;
+    bool isSameKind_;
+    std::string why_; // the last assignment that failed did
+};

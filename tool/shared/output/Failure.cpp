@@ -1,0 +1,28 @@
+#include "tool/shared/output/Failure.h"
+
+#include "platform/core/Status.h"
+#include "tool/shared/output/UnseenCharacters.h"
+
+#include <fmt/core.h>
+
+#include <cerrno>
+#include <cstdio>
+#include <cstring>
+
+std::string systemErrorText(int error)
+{
+    const std::int32_t status = PosixErrorToOSErr(error);
+    return status == kStatusIOError && error != EIO ? std::strerror(error) : StatusText(status);
+}
+
+void requireOK(std::int32_t status)
+{
+    if (status != kStatusOK)
+        throw Failure(StatusText(status));
+}
+
+void reportFailure(const std::string& path, const std::string& text)
+{
+    // Not by fmt::print, which throws where standard error cannot be written: the work is not to end for that.
+    std::fputs(fmt::format("ktfiles: {}: {}\n", printableOnError(path), printableOnError(text)).c_str(), stderr);
+}

@@ -1,0 +1,70 @@
+#include "tool/shared/output/Output.h"
+
+#include "tool/shared/output/Failure.h"
+#include "tool/shared/output/UnseenCharacters.h"
+
+#include <nlohmann/json.hpp>
+
+#include <cerrno>
+#include <poll.h>
+#include <unistd.h>
+
+Form outputForm(const OutputOptions& options)
+{
+    if (options.json)
+        return Form::json;
+    if (options.quiet)
+        return Form::none;
+    return isTerminal(STDOUT_FILENO) || options.color == ColorMode::always ? Form::table : Form::lines;
+}
+
+Output& Output::standard()
+{
+    static Output output;
+    return output;
+}
+
+void Output::write(std::string_view bytes)
+{
+    if (buffer_.size() + bytes.size() >= kFlushSize) {
+        flush();
+        writeThrough(bytes);
+    } else {
+        buffer_.append(bytes);
+    }
+}
+
+bool Output::flush()
+{
+    writeThrough({buffer_.data(), buffer_.size()});
+    buffer_.clear();
+    return !failed();
+}
+
+void Output::writeThrough(std::string_view bytes)
+{
+    while (!bytes.empty() && !failed()) {
+        const ssize_t written = ::write(STDOUT_FILENO, bytes.data(), bytes.size());
+        if (written >= 0) {
+            bytes.remove_prefix(static_cast<std::size_t>(written));
+        } else if (errno == EAGAIN) { // whoever shares the pipe with us made it non-blocking
+            pollfd ready{STDOUT_FILENO, POLLOUT, 0};
+            ::poll(&ready, 1, -1);
+        } else if (errno != EINTR) {
+            error_ = errno;
+        }
+    }
+}
+
+bool Output::finish()
+{
+    flush();
+    if (failed() && error_ != EPIPE)
+        reportFailure("standard output", systemErrorText(error_));
+    return !failed();
+}
+
+std::string jsonText(const nlohmann::ordered_json& value)
+{
+    return withEscapes(value.dump(-1, ' ', false, nlohmann::ordered_json::error_handler_t::replace));
+}

@@ -1,0 +1,103 @@
+#include "tool/tags/TagsCommand.h"
+
+#include "tool/shared/access/FileAccess.h"
+#include "tool/shared/arguments/CommandLine.h"
+#include "tool/shared/input/FileByFile.h"
+#include "tool/shared/looptags/LoopTags.h"
+#include "tool/shared/output/Failure.h"
+
+#include <nlohmann/json.hpp>
+
+namespace {
+
+// Writes the tags of one file after the other, each as soon as they are read.
+class TagsWriter {
+public:
+    /// With `several` files each line says which.
+    TagsWriter(const OutputOptions& options, bool several)
+        : form_(outputForm(options)),
+          color_(usesColor(options.color)),
+          several_(several)
+    {
+    }
+
+    void add(const std::string& path, const LoopTags& tags)
+    {
+        if (form_ == Form::json)
+            addJson(loopTagsJson(path, tags));
+        else if (form_ == Form::table)
+            addTable(path, tags);
+        else if (form_ == Form::lines)
+            for (const TagLine& line : tagLines(tags))
+                output_.print("{}{}{}\t{}\n", several_ ? printable(path) : "", several_ ? "\t" : "", line.name,
+                              printable(line.text));
+        first_ = false;
+    }
+
+    void addFailure(const std::string& path, const std::string& text)
+    {
+        if (form_ == Form::json)
+            addJson(jsonText({{"path", path}, {"error", text}}));
+        first_ = first_ && form_ != Form::json;
+    }
+
+    void finish()
+    {
+        if (form_ == Form::json)
+            output_.print("{}]\n", first_ ? "[" : "\n");
+    }
+
+private:
+    void addJson(std::string_view object)
+    {
+        output_.write(first_ ? "[\n" : ",\n");
+        output_.write(object);
+    }
+
+    void addTable(const std::string& path, const LoopTags& tags)
+    {
+        constexpr int kLabelWidth = 12;
+        output_.print("{}{}{}{}  {}\n", first_ ? "" : "\n", color_ ? "\x1b[1m" : "", printable(path),
+                      color_ ? "\x1b[0m" : "", loopContainerName(tags.fileType));
+        const auto lines = tagLines(tags);
+        for (const TagLine& line : lines)
+            output_.print("  {:<{}}  {}{}\n", line.label, kLabelWidth, printable(line.text),
+                          line.name == std::string_view("tempo") ? " BPM" : "");
+        if (lines.empty())
+            output_.print("  no loop tags\n");
+    }
+
+    Form form_;
+    bool color_;
+    bool several_;
+    bool first_ = true;
+    Output& output_ = Output::standard();
+};
+
+bool runTags(const std::vector<std::string>& files, const OutputOptions& options)
+{
+    TagsWriter writer(options, files.size() > 1);
+    return writeFileByFile(writer, files, [&](const std::string& path) {
+        const FileAccess access = accessForReading(path, {.quiet = options.quiet});
+        return readLoopTags(path);
+    });
+}
+
+void declareTags(CommandLine& commandLine)
+{
+    static std::vector<std::string> files;
+    CLI::App& verb = commandLine.addVerb("tags", "Show the loop tags of AIFF and CAF files; set, remove or copy some",
+                                         [&commandLine] {
+                                             if (files.empty())
+                                                 throw CLI::RequiredError("FILE");
+                                             return runTags(files, commandLine.output());
+                                         });
+    CommandLine::addFiles(verb, files);
+    declareTagsSet(commandLine, verb);
+    declareTagsRemove(commandLine, verb);
+    declareTagsCopy(commandLine, verb);
+}
+
+const VerbRegistration registration{30, declareTags};
+
+} // namespace

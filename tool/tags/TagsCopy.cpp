@@ -1,0 +1,43 @@
+// ktfiles tags copy: every kind of loop chunk from one file to others, AIFF and CAF in either direction.
+#include "tool/shared/access/FileAccess.h"
+#include "tool/shared/arguments/CommandLine.h"
+#include "tool/shared/looptags/LoopTagsCopy.h"
+#include "tool/shared/output/Failure.h"
+#include "tool/tags/TagsCommand.h"
+
+namespace {
+
+struct CopyArguments {
+    std::string from;
+    std::vector<std::string> to;
+    EditOptions options;
+};
+
+bool runCopy(const CopyArguments& arguments, const OutputOptions& output)
+{
+    std::shared_ptr<const LoopSource> source;
+    if (!reportingFailures(arguments.from, [&] {
+            const FileAccess access = accessForReading(arguments.from, arguments.options.waiting());
+            source = readLoopSource(arguments.from);
+            if (source->isEmpty())
+                throw Failure("has no loop tags");
+        }))
+        return false;
+    const TagsEditor editor{"copy", "copied", "would copy", [&](const LoopTags& before, const std::string& target) {
+                                return planTagsCopy(source, before, target);
+                            }};
+    return editTags(arguments.to, editor, arguments.options, output);
+}
+
+} // namespace
+
+void declareTagsCopy(CommandLine& commandLine, CLI::App& tags)
+{
+    static CopyArguments arguments;
+    CLI::App& verb = commandLine.addVerb(
+        "copy", "Copy all that makes a loop to other files",
+        [&commandLine] { return runCopy(arguments, commandLine.output()); }, &tags);
+    CommandLine::addFile(verb, arguments.from, "FROM")->required()->description("The file to copy from");
+    CommandLine::addFiles(verb, arguments.to, "TO")->required()->description("The files to copy to");
+    CommandLine::addEditOptions(verb, arguments.options);
+}

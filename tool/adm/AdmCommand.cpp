@@ -6,10 +6,8 @@
 #include "tool/shared/access/FileAccess.h"
 #include "tool/shared/arguments/CommandLine.h"
 #include "tool/shared/output/Failure.h"
-#include "tool/shared/output/JsonWriter.h"
+#include "tool/shared/output/JsonRecords.h"
 #include "tool/shared/output/Progress.h"
-
-#include <nlohmann/json.hpp>
 
 #include <limits>
 
@@ -92,24 +90,24 @@ public:
     AdmCommand(const AdmArguments& arguments, const OutputOptions& options)
         : arguments_(arguments),
           options_(options),
-          form_(outputForm(options))
+          form_(outputForm(options)),
+          json_(arguments.files.size() > 1 ? JsonRecords::Shape::array : JsonRecords::Shape::single)
     {
     }
 
     bool run()
     {
-        const bool isArray = form_ == Form::json && arguments_.files.size() > 1;
         bool good = true;
-        output_.write(isArray ? "[\n" : "");
         for (const std::string& path : arguments_.files) {
             if (output_.failed())
                 break;
             if (&path != &arguments_.files.front())
-                output_.write(isArray ? ",\n" : form_ == Form::table && !arguments_.isCheck ? "\n" : "");
+                output_.write(form_ == Form::table && !arguments_.isCheck ? "\n" : "");
             if (!runFile(path))
                 good = false;
         }
-        output_.write(isArray ? "\n]\n" : form_ == Form::json ? "\n" : "");
+        if (form_ == Form::json)
+            json_.finish();
         return good;
     }
 
@@ -151,14 +149,14 @@ private:
     {
         reportFailure(place, text);
         if (form_ == Form::json)
-            output_.write(jsonText({{"path", path}, {"error", text}}));
+            json_.addFailure(path, text);
         return false;
     }
 
     bool check(const std::string& path, const ReadDocument& read)
     {
         if (form_ == Form::json) {
-            JsonWriter json(output_);
+            JsonWriter& json = json_.next();
             json.beginObject();
             json.member("path", path);
             json.key("problems");
@@ -174,7 +172,7 @@ private:
     void show(const std::string& path, const ReadDocument& read)
     {
         if (form_ == Form::json) {
-            writeAdmJson(output_, path, *read.document, arguments_.isLenient ? &read.diagnostics : nullptr);
+            writeAdmJson(json_.next(), path, *read.document, arguments_.isLenient ? &read.diagnostics : nullptr);
             return;
         }
         if (form_ == Form::table)
@@ -230,6 +228,7 @@ private:
     const OutputOptions& options_;
     Form form_;
     Output& output_ = Output::standard();
+    JsonRecords json_;
 };
 
 void declareAdm(CommandLine& commandLine)

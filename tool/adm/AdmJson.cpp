@@ -211,10 +211,9 @@ void writeElements(JsonWriter& json, std::string_view key, const ADMElementTable
 
 } // namespace
 
-void writeAdmJson(Output& output, const std::string& path, const ADMDocument& document,
+void writeAdmJson(JsonWriter& json, const std::string& path, const ADMDocument& document,
                   const std::vector<ADMDiagnostic>* diagnostics)
 {
-    JsonWriter json(output);
     json.beginObject();
     json.member("path", path);
     writeElements(json, "programmes", document.audioProgrammes());

@@ -2,7 +2,6 @@
 #pragma once
 
 #include "adm/ADMDocument.h"
-#include "tool/shared/output/Output.h"
 
 #include <string>
 #include <vector>
@@ -11,7 +10,7 @@ class JsonWriter;
 
 /// The keys "path", one for each kind of element, and "diagnostics" unless that is null. Times are microseconds, null
 /// where they are not given. Nothing but one element is held at a time; no line break behind the object.
-void writeAdmJson(Output& output, const std::string& path, const ADMDocument& document,
+void writeAdmJson(JsonWriter& json, const std::string& path, const ADMDocument& document,
                   const std::vector<ADMDiagnostic>* diagnostics);
 
 /// An array of objects with the keys "line", "column", "name", "elementID" and "reason".

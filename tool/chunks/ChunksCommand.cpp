@@ -4,9 +4,8 @@
 #include "tool/shared/arguments/CommandLine.h"
 #include "tool/shared/input/InputFile.h"
 #include "tool/shared/output/Failure.h"
+#include "tool/shared/output/JsonRecords.h"
 #include "tool/shared/output/Table.h"
-
-#include <nlohmann/json.hpp>
 
 #include <optional>
 
@@ -16,8 +15,9 @@ namespace {
 class ChunkListWriter {
 public:
     /// With `several` files each line, or heading, says which.
-    ChunkListWriter(const OutputOptions& options, std::string path, bool several)
-        : form_(outputForm(options)),
+    ChunkListWriter(const OutputOptions& options, JsonRecords& json, std::string path, bool several)
+        : json_(json),
+          form_(outputForm(options)),
           color_(usesColor(options.color)),
           several_(several),
           path_(std::move(path))
@@ -29,11 +29,11 @@ public:
         extent_ = extent;
         begun_ = true;
         if (form_ == Form::json) {
-            const std::string head = jsonText({{"path", path_},
-                                               {"container", fourCCText(extent.id)},
-                                               {"containerEnd", extent.end},
-                                               {"chunks", nlohmann::ordered_json::array()}});
-            output_.write(std::string_view(head).substr(0, head.size() - 2)); // up to the list's "["
+            JsonWriter& json = json_.next();
+            json.beginObject();
+            json.member("path", path_).member("container", fourCCText(extent.id)).member("containerEnd", extent.end);
+            json.key("chunks").beginArray();
+            list_ = &json;
         } else if (form_ == Form::table) {
             output_.print("{}  {}, {} bytes\n", printable(path_), fourCCText(extent.id), extent.end);
             const int width = std::max(static_cast<int>(fmt::formatted_size("{}", extent.fileLength)), 6);
@@ -46,9 +46,13 @@ public:
     bool add(const ChunkEntry& chunk)
     {
         const std::string id = fourCCText(chunk.id);
-        if (form_ == Form::json) // by hand, since there may be very many
-            output_.print("{}\n{{\"id\":{},\"offset\":{},\"size\":{}}}", std::exchange(first_, false) ? "" : ",",
-                          jsonText(id), chunk.offset, chunk.size);
+        if (form_ == Form::json)
+            list_->newLine()
+                .beginObject()
+                .member("id", id)
+                .member("offset", chunk.offset)
+                .member("size", chunk.size)
+                .endObject();
         else if (form_ == Form::table)
             table_->printRow(output_, {id, std::to_string(chunk.offset), std::to_string(chunk.size)});
         else if (form_ == Form::lines)
@@ -61,20 +65,29 @@ public:
     void end(const std::string& error)
     {
         if (form_ == Form::json && !begun_)
-            output_.write(jsonText({{"path", path_}, {"error", error}}));
+            json_.addFailure(path_, error);
         else if (form_ == Form::json)
-            output_.print("{}]{}}}", first_ ? "" : "\n", error.empty() ? "" : ",\"error\":" + jsonText(error));
+            endList(error);
         else if (form_ == Form::table && begun_ && extent_.end < extent_.fileLength)
             output_.print("{} bytes follow the container\n", extent_.fileLength - extent_.end);
     }
 
 private:
+    void endList(const std::string& error)
+    {
+        list_->endArrayOfLines();
+        if (!error.empty())
+            list_->member("error", error);
+        list_->endObject();
+    }
+
+    JsonRecords& json_;
+    JsonWriter* list_ = nullptr; // of the file's object, once that has begun
     Form form_;
     bool color_;
     bool several_;
     std::string path_;
     bool begun_ = false;
-    bool first_ = true;
     ContainerExtent extent_;
     std::optional<Table> table_;
     Output& output_ = Output::standard();
@@ -104,13 +117,13 @@ bool runList(const std::vector<std::string>& files, const OutputOptions& options
 {
     Output& output = Output::standard();
     const bool several = files.size() > 1;
-    const bool array = several && options.json;
     const bool table = outputForm(options) == Form::table;
+    JsonRecords json(several ? JsonRecords::Shape::array : JsonRecords::Shape::single);
     bool good = true;
     for (const std::string& path : files) {
         const bool first = &path == &files.front();
-        output.write(array ? (first ? "[\n" : ",\n") : table && !first ? "\n" : "");
-        ChunkListWriter writer(options, path, several);
+        output.write(table && !first ? "\n" : "");
+        ChunkListWriter writer(options, json, path, several);
         std::string error;
         if (!reportingFailures(path, [&] {
                 try {
@@ -125,7 +138,8 @@ bool runList(const std::vector<std::string>& files, const OutputOptions& options
         if (output.failed())
             break;
     }
-    output.write(array ? "\n]\n" : options.json ? "\n" : "");
+    if (options.json)
+        json.finish();
     return good;
 }
 

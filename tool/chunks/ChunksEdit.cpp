@@ -5,8 +5,7 @@
 #include "tool/shared/arguments/CommandLine.h"
 #include "tool/shared/input/InputFile.h"
 #include "tool/shared/output/Failure.h"
-
-#include <nlohmann/json.hpp>
+#include "tool/shared/output/JsonWriter.h"
 
 #include <cerrno>
 #include <fcntl.h>
@@ -71,19 +70,21 @@ void print(const EditArguments& arguments, const OutputOptions& output, const Ed
 {
     const bool adds = report.action == std::string_view("add");
     if (output.json) {
-        nlohmann::ordered_json json{{"path", arguments.file},
-                                    {"action", report.action},
-                                    {"id", fourCCText(arguments.id)},
-                                    {"count", report.count},
-                                    {"size", report.size}};
+        JsonWriter json(Output::standard());
+        json.beginObject();
+        json.member("path", arguments.file);
+        json.member("action", report.action);
+        json.member("id", fourCCText(arguments.id));
+        json.member("count", report.count);
+        json.member("size", report.size);
         if (adds)
-            json["replaced"] = report.replaced;
-        json["dryRun"] = arguments.options.dryRun;
+            json.member("replaced", report.replaced);
+        json.member("dryRun", arguments.options.dryRun);
         if (!report.where.empty())
-            json["where"] = report.where;
+            json.member("where", report.where);
         if (!report.backup.empty())
-            json["backup"] = report.backup;
-        Output::standard().print("{}\n", jsonText(json));
+            json.member("backup", report.backup);
+        json.endObject().endLine();
     } else if (!output.quiet) {
         const std::string what = report.count == 1 ? "chunk" : fmt::format("{} chunks", report.count);
         const char* const verb =

@@ -7,10 +7,9 @@
 #include "tool/shared/input/ChunkBody.h"
 #include "tool/shared/input/InputFile.h"
 #include "tool/shared/output/Failure.h"
+#include "tool/shared/output/JsonWriter.h"
 #include "tool/shared/output/Progress.h"
 #include "tool/shared/output/UnseenCharacters.h"
-
-#include <nlohmann/json.hpp>
 
 #include <algorithm>
 #include <unistd.h>
@@ -78,10 +77,14 @@ void getFromAnywhere(const GetArguments& arguments, const OutputOptions& options
     const SidecarChunk chunk = readFromAnywhere(arguments.file, arguments.id, arguments.sidecar);
     put([&](const Sink& sink) { sink(textOf(chunk.body)); }, arguments);
     if (options.json)
-        Output::standard().print("{}\n", jsonText({{"path", arguments.file},
-                                                   {"id", fourCCText(arguments.id)},
-                                                   {"source", chunk.source},
-                                                   {"size", chunk.body.size()}}));
+        JsonWriter(Output::standard())
+            .beginObject()
+            .member("path", arguments.file)
+            .member("id", fourCCText(arguments.id))
+            .member("source", chunk.source)
+            .member("size", chunk.body.size())
+            .endObject()
+            .endLine();
 }
 
 void getChunk(const GetArguments& arguments, const OutputOptions& options)
@@ -95,8 +98,14 @@ void getChunk(const GetArguments& arguments, const OutputOptions& options)
     const std::string id = fourCCText(arguments.id);
     put([&](const Sink& sink) { copyBody(file, chunk.offset, chunk.size, options.quiet, sink); }, arguments);
     if (options.json)
-        Output::standard().print(
-            "{}\n", jsonText({{"path", arguments.file}, {"id", id}, {"offset", chunk.header}, {"size", chunk.size}}));
+        JsonWriter(Output::standard())
+            .beginObject()
+            .member("path", arguments.file)
+            .member("id", id)
+            .member("offset", chunk.header)
+            .member("size", chunk.size)
+            .endObject()
+            .endLine();
 }
 
 } // namespace

@@ -3,10 +3,7 @@
 #include "tool/shared/output/ClockTime.h"
 #include "tool/shared/output/Terminal.h"
 
-#include <nlohmann/json.hpp>
-
 #include <cmath>
-#include <utility>
 
 namespace {
 
@@ -21,23 +18,24 @@ std::string soundText(const DecodeResult& result)
                        depthText(sound.depth), channels);
 }
 
-nlohmann::ordered_json asJson(const std::string& path, const DecodeResult& result)
+void writeJson(JsonWriter& json, const std::string& path, const DecodeResult& result)
 {
     const DecodedSound& sound = result.sound;
-    nlohmann::ordered_json json{{"path", path},
-                                {"output", result.output},
-                                {"format", result.container},
-                                {"sampleRate", std::llround(sound.sampleRate)},
-                                {"channels", sound.channels},
-                                {"bits", sound.depth.bits},
-                                {"floatingPoint", sound.depth.isFloat},
-                                {"frames", sound.frames},
-                                {"clippedSamples", result.clippedSamples},
-                                {"missingFrames", result.missingFrames},
-                                {"tags", result.tags.keys}};
+    json.beginObject();
+    json.member("path", path);
+    json.member("output", result.output);
+    json.member("format", result.container);
+    json.member("sampleRate", std::llround(sound.sampleRate));
+    json.member("channels", sound.channels);
+    json.member("bits", sound.depth.bits);
+    json.member("floatingPoint", sound.depth.isFloat);
+    json.member("frames", sound.frames);
+    json.member("clippedSamples", result.clippedSamples);
+    json.member("missingFrames", result.missingFrames);
+    json.member("tags", result.tags.keys);
     if (!result.tags.notKept.empty())
-        json["notKept"] = result.tags.notKept;
-    return json;
+        json.member("notKept", result.tags.notKept);
+    json.endObject();
 }
 
 } // namespace
@@ -45,7 +43,7 @@ nlohmann::ordered_json asJson(const std::string& path, const DecodeResult& resul
 void DecodeReport::add(const std::string& path, const DecodeResult& result)
 {
     if (form_ == Form::json)
-        addJson(jsonText(asJson(path, result)));
+        writeJson(json_.next(), path, result);
     else if (form_ != Form::none)
         output_.print("{}: decoded to {}, {}{}\n", printable(path), printable(result.output), soundText(result),
                       result.tags.keys.empty() ? "" : ", with its tags");
@@ -56,16 +54,11 @@ void DecodeReport::add(const std::string& path, const DecodeResult& result)
 void DecodeReport::addFailure(const std::string& path, const std::string& text)
 {
     if (form_ == Form::json)
-        addJson(jsonText({{"path", path}, {"error", text}}));
-}
-
-void DecodeReport::addJson(const std::string& json)
-{
-    output_.print("{}{}", std::exchange(first_, false) ? "[\n" : ",\n", json);
+        json_.addFailure(path, text);
 }
 
 void DecodeReport::finish()
 {
     if (form_ == Form::json)
-        output_.print("{}]\n", first_ ? "[" : "\n");
+        json_.finish();
 }

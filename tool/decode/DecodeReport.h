@@ -2,7 +2,7 @@
 #pragma once
 
 #include "tool/decode/DecodeFile.h"
-#include "tool/shared/output/Output.h"
+#include "tool/shared/output/JsonRecords.h"
 
 #include <string>
 
@@ -16,9 +16,7 @@ public:
     void finish();
 
 private:
-    void addJson(const std::string& json);
-
     Form form_;
-    bool first_ = true;
     Output& output_ = Output::standard();
+    JsonRecords json_;
 };

@@ -6,9 +6,8 @@
 #include "tool/shared/input/InputFile.h"
 #include "tool/shared/output/ClockTime.h"
 #include "tool/shared/output/Failure.h"
+#include "tool/shared/output/JsonRecords.h"
 #include "tool/shared/output/Table.h"
-
-#include <nlohmann/json.hpp>
 
 #include <algorithm>
 
@@ -110,29 +109,30 @@ std::string typeByNameText(const FileFacts& facts)
     return facts.typeByName != 0 ? fourCCText(facts.typeByName) : "";
 }
 
-nlohmann::ordered_json asJson(const std::string& path, const AudioFileInfo& info, const FileFacts& facts)
+void writeJson(JsonWriter& json, const std::string& path, const AudioFileInfo& info, const FileFacts& facts)
 {
-    nlohmann::ordered_json json = {{"path", path},
-                                   {"container", fourCCText(info.containerId)},
-                                   {"fileType", fourCCText(info.fileType)},
-                                   {"formatCode", fourCCText(info.formatCode)},
-                                   {"sampleRate", info.sampleRate},
-                                   {"bitsPerSample", info.bitsPerSample},
-                                   {"channels", info.channels},
-                                   {"floatingPoint", info.floatingPoint},
-                                   {"frames", info.frames},
-                                   {"durationSeconds", durationOf(info)},
-                                   {"dataOffset", info.dataOffset},
-                                   {"fileLength", info.fileLength},
-                                   {"typeByName", typeByNameText(facts)},
-                                   {"modified", dateText(facts.modified)}};
+    json.beginObject();
+    json.member("path", path);
+    json.member("container", fourCCText(info.containerId));
+    json.member("fileType", fourCCText(info.fileType));
+    json.member("formatCode", fourCCText(info.formatCode));
+    json.member("sampleRate", info.sampleRate);
+    json.member("bitsPerSample", info.bitsPerSample);
+    json.member("channels", info.channels);
+    json.member("floatingPoint", info.floatingPoint);
+    json.member("frames", info.frames);
+    json.member("durationSeconds", durationOf(info));
+    json.member("dataOffset", info.dataOffset);
+    json.member("fileLength", info.fileLength);
+    json.member("typeByName", typeByNameText(facts));
+    json.member("modified", dateText(facts.modified));
     if (info.framesAreStated)
-        json["framesAreStated"] = true; // no decoder could count them
+        json.member("framesAreStated", true); // no decoder could count them
     if (facts.stereo) {
-        json["stereoPartner"] = facts.stereo->partner;
-        json["stereoPartnerExists"] = facts.stereo->partnerExists;
+        json.member("stereoPartner", facts.stereo->partner);
+        json.member("stereoPartnerExists", facts.stereo->partnerExists);
     }
-    return json;
+    json.endObject();
 }
 
 std::vector<Table::Column> columns(bool isLong)
@@ -158,7 +158,7 @@ public:
     {
         const FileFacts facts = form_ == Form::json || isLong_ ? factsOf(path) : FileFacts();
         if (form_ == Form::json)
-            addJson(asJson(path, info, facts));
+            writeJson(json_.next(), path, info, facts);
         else if (form_ == Form::table)
             addRow(path, info, facts);
         else if (form_ == Form::lines)
@@ -168,13 +168,13 @@ public:
     void addFailure(const std::string& path, const std::string& text)
     {
         if (form_ == Form::json)
-            addJson({{"path", path}, {"error", text}});
+            json_.addFailure(path, text);
     }
 
     void finish()
     {
         if (form_ == Form::json)
-            output_.print("{}]\n", first_ ? "[" : "\n");
+            json_.finish();
         table_.print(output_, color_);
     }
 
@@ -205,16 +205,11 @@ private:
         output_.write("\n");
     }
 
-    void addJson(const nlohmann::ordered_json& object)
-    {
-        output_.print("{}{}", std::exchange(first_, false) ? "[\n" : ",\n", jsonText(object));
-    }
-
     Form form_;
     bool color_;
     bool isLong_;
-    bool first_ = true;
     Output& output_ = Output::standard();
+    JsonRecords json_;
     Table table_{columns(isLong_)};
 };
 

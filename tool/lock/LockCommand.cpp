@@ -9,8 +9,7 @@
 #include "tool/shared/arguments/CommandLine.h"
 #include "tool/shared/arguments/TimeoutOption.h"
 #include "tool/shared/output/Failure.h"
-
-#include <nlohmann/json.hpp>
+#include "tool/shared/output/JsonWriter.h"
 
 #include <algorithm>
 #include <array>
@@ -135,7 +134,13 @@ void sayHeld(const LockArguments& arguments, const OutputOptions& options)
     Output& output = Output::standard();
     switch (outputForm(options)) {
     case Form::json:
-        output.print("{}\n", jsonText({{"path", arguments.file}, {"lock", arguments.kind()}, {"held", true}}));
+        JsonWriter(output)
+            .beginObject()
+            .member("path", arguments.file)
+            .member("lock", arguments.kind())
+            .member("held", true)
+            .endObject()
+            .endLine();
         break;
     case Form::table:
         output.print("{}: {} lock held; end of input{} releases it\n", printable(arguments.file), arguments.kind(),

@@ -4,9 +4,8 @@
 #include "tool/shared/access/Parties.h"
 #include "tool/shared/arguments/CommandLine.h"
 #include "tool/shared/output/Failure.h"
+#include "tool/shared/output/JsonRecords.h"
 #include "tool/shared/output/Table.h"
-
-#include <nlohmann/json.hpp>
 
 namespace {
 
@@ -38,12 +37,15 @@ public:
         const char* const access = party.isWriting ? "write" : "read";
         const std::string item = path.empty() ? fmt::format("item:{:012x}", party.itemNumber) : printable(path);
         if (form_ == Form::json)
-            addJson({{"path", path.empty() ? nlohmann::ordered_json() : nlohmann::ordered_json(path)},
-                     {"item", party.itemNumber},
-                     {"role", role},
-                     {"access", access},
-                     {"processID", party.processID},
-                     {"command", name}});
+            json_.next()
+                .beginObject()
+                .member("path", path.empty() ? std::nullopt : std::optional(path))
+                .member("item", party.itemNumber)
+                .member("role", role)
+                .member("access", access)
+                .member("processID", party.processID)
+                .member("command", name)
+                .endObject();
         else if (form_ == Form::table)
             table_.add({item, role, access, std::to_string(party.processID), printable(name)});
         else if (form_ == Form::lines)
@@ -53,26 +55,21 @@ public:
     void addFailure(const std::string& path, const std::string& text)
     {
         if (form_ == Form::json)
-            addJson({{"path", path}, {"error", text}});
+            json_.addFailure(path, text);
     }
 
     void finish()
     {
         if (form_ == Form::json)
-            output_.print("{}]\n", first_ ? "[" : "\n");
+            json_.finish();
         table_.print(output_, color_);
     }
 
 private:
-    void addJson(const nlohmann::ordered_json& object)
-    {
-        output_.print("{}{}", std::exchange(first_, false) ? "[\n" : ",\n", jsonText(object));
-    }
-
     Form form_;
     bool color_;
-    bool first_ = true;
     Output& output_ = Output::standard();
+    JsonRecords json_;
     Table table_{{{"FILE"}, {"ROLE"}, {"ACCESS"}, {"PROCESS", Align::right}, {"COMMAND"}}};
 };
 

@@ -4,8 +4,6 @@
 #include "tool/shared/output/ClockTime.h"
 #include "tool/shared/output/Terminal.h"
 
-#include <nlohmann/json.hpp>
-
 #include <algorithm>
 
 namespace {
@@ -63,8 +61,8 @@ std::string storeText(const StoreResult& store, bool dryRun, std::size_t points)
 OverviewReport::OverviewReport(const OutputOptions& options, const std::vector<std::string>& files)
     : form_(outputForm(options)),
       color_(usesColor(options.color)),
-      several_(files.size() > 1),
-      columns_(terminalColumns())
+      columns_(terminalColumns()),
+      json_(files.size() > 1 ? JsonRecords::Shape::array : JsonRecords::Shape::single)
 {
     for (const std::string& path : files)
         nameWidth_ = std::max(nameWidth_, displayWidth(printable(path)));
@@ -110,42 +108,34 @@ void OverviewReport::addDeeds(const std::string& path, const Waveform& waveform,
 
 void OverviewReport::addJson(const std::string& path, const Waveform& waveform, const OverviewDeeds& deeds)
 {
-    beginJson();
-    // By hand, since twelve hours are eight million points.
-    output_.print("{{\"path\":{},\"frames\":{},\"framesPerPoint\":{},\"points\":[", jsonText(path), waveform.frames,
-                  kOverviewFramesPerPoint);
-    bool first = true;
+    JsonWriter& json = json_.next();
+    json.beginObject();
+    json.member("path", path).member("frames", waveform.frames).member("framesPerPoint", kOverviewFramesPerPoint);
+    json.key("points").beginArray();
     for (const OverviewPoint& point : waveform.points)
-        output_.print("{}[{},{}]", std::exchange(first, false) ? "" : ",", point.minimum, point.maximum);
-    output_.print("]");
-    for (const auto& [key, out] : {std::pair("png", deeds.png), std::pair("svg", deeds.svg)})
-        if (!out.empty())
-            output_.print(",\"{}\":{}", key, jsonText(out));
+        json.beginArray().write(point.minimum).write(point.maximum).endArray();
+    json.endArray();
+    if (!deeds.png.empty())
+        json.member("png", deeds.png);
+    if (!deeds.svg.empty())
+        json.member("svg", deeds.svg);
     if (deeds.store) {
-        output_.print(",\"stored\":{},\"changed\":{},\"dryRun\":{}", deeds.store->stored, deeds.store->changed,
-                      deeds.dryRun);
+        json.member("stored", deeds.store->stored).member("changed", deeds.store->changed);
+        json.member("dryRun", deeds.dryRun);
         if (!deeds.store->backup.empty())
-            output_.print(",\"backup\":{}", jsonText(deeds.store->backup));
+            json.member("backup", deeds.store->backup);
     }
-    output_.print("}}");
+    json.endObject();
 }
 
 void OverviewReport::addFailure(const std::string& path, const std::string& text)
 {
-    if (form_ != Form::json)
-        return;
-    beginJson();
-    output_.write(jsonText({{"path", path}, {"error", text}}));
-}
-
-void OverviewReport::beginJson()
-{
-    if (several_)
-        output_.write(std::exchange(first_, false) ? "[\n" : ",\n");
+    if (form_ == Form::json)
+        json_.addFailure(path, text);
 }
 
 void OverviewReport::finish()
 {
     if (form_ == Form::json)
-        output_.write(several_ ? "\n]\n" : "\n");
+        json_.finish();
 }

@@ -3,7 +3,7 @@
 
 #include "tool/overview/FileOverview.h"
 #include "tool/overview/OverviewStore.h"
-#include "tool/shared/output/Output.h"
+#include "tool/shared/output/JsonRecords.h"
 
 #include <optional>
 #include <string>
@@ -32,13 +32,11 @@ private:
     void addSparkline(const std::string& path, const Waveform& waveform);
     void addDeeds(const std::string& path, const Waveform& waveform, const OverviewDeeds& deeds);
     void addJson(const std::string& path, const Waveform& waveform, const OverviewDeeds& deeds);
-    void beginJson();
 
     Form form_;
     bool color_;
-    bool several_;
-    bool first_ = true;
     int nameWidth_ = 0;
     int columns_;
     Output& output_ = Output::standard();
+    JsonRecords json_;
 };

@@ -3,9 +3,8 @@
 #include "tool/shared/input/FileFacts.h"
 #include "tool/shared/input/FolderWalk.h"
 #include "tool/shared/output/Failure.h"
+#include "tool/shared/output/JsonRecords.h"
 #include "tool/shared/output/Table.h"
-
-#include <nlohmann/json.hpp>
 
 #include <set>
 
@@ -28,11 +27,13 @@ public:
     void add(const Pair& pair)
     {
         if (form_ == Form::json)
-            output_.print("{}{}", std::exchange(first_, false) ? "[\n" : ",\n",
-                          jsonText({{"left", pair.left},
-                                    {"right", pair.right},
-                                    {"leftExists", pair.hasLeft},
-                                    {"rightExists", pair.hasRight}}));
+            json_.next()
+                .beginObject()
+                .member("left", pair.left)
+                .member("right", pair.right)
+                .member("leftExists", pair.hasLeft)
+                .member("rightExists", pair.hasRight)
+                .endObject();
         else if (form_ == Form::table)
             table_.add({printable(pair.left), printable(pair.right), stateOf(pair)});
         else if (form_ == Form::lines)
@@ -42,15 +43,15 @@ public:
     void finish()
     {
         if (form_ == Form::json)
-            output_.print("{}]\n", first_ ? "[" : "\n");
+            json_.finish();
         table_.print(output_, color_);
     }
 
 private:
     Form form_;
     bool color_;
-    bool first_ = true;
     Output& output_ = Output::standard();
+    JsonRecords json_;
     Table table_{{{"LEFT"}, {"RIGHT"}, {"STATE"}}};
 };
 

@@ -10,8 +10,7 @@
 #include "tool/shared/arguments/CommandLine.h"
 #include "tool/shared/arguments/TimeoutOption.h"
 #include "tool/shared/output/Failure.h"
-
-#include <nlohmann/json.hpp>
+#include "tool/shared/output/JsonRecords.h"
 
 #include <cstdlib>
 #include <limits>
@@ -30,8 +29,10 @@ bool runOn(const std::string& path, const OutputOptions& output, const std::func
         try {
             work();
         } catch (const Failure& failure) {
-            if (output.json)
-                Output::standard().print("{}\n", jsonText({{"path", path}, {"error", failure.what()}}));
+            if (JsonRecords json(JsonRecords::Shape::single); output.json) {
+                json.addFailure(path, failure.what());
+                json.finish();
+            }
             throw;
         }
     });
@@ -43,10 +44,12 @@ void backUp(const ProjectArguments& arguments, const OutputOptions& output)
         const auto project = openProject(package);
         const long alternative = alternativeOf(*project, arguments.alternative);
         const std::string name = makeBackup(*project, alternative, arguments.keep, arguments.edit.dryRun, output.quiet);
-        nlohmann::ordered_json json{{"alternative", alternative}, {"dryRun", arguments.edit.dryRun}};
-        if (!name.empty())
-            json["backup"] = name;
-        printProjectEdit(arguments.package, output, json,
+        const auto members = [&](JsonWriter& json) {
+            json.member("alternative", alternative).member("dryRun", arguments.edit.dryRun);
+            if (!name.empty())
+                json.member("backup", name);
+        };
+        printProjectEdit(arguments.package, output, members,
                          name.empty() ? fmt::format("would copy alternative {} to a new backup", alternative)
                                       : fmt::format("copied alternative {} to backup {}", alternative, name));
     });
@@ -80,13 +83,13 @@ void renameAlternative(const ProjectArguments& arguments, const OutputOptions& o
                         &error))
                     throw Failure(error.description);
             });
-        nlohmann::ordered_json json{{"alternative", arguments.index},
-                                    {"name", arguments.name},
-                                    {"before", before},
-                                    {"dryRun", arguments.edit.dryRun}};
-        if (!backup.empty())
-            json["backup"] = backup;
-        printProjectEdit(arguments.package, output, json,
+        const auto members = [&](JsonWriter& json) {
+            json.member("alternative", arguments.index).member("name", arguments.name).member("before", before);
+            json.member("dryRun", arguments.edit.dryRun);
+            if (!backup.empty())
+                json.member("backup", backup);
+        };
+        printProjectEdit(arguments.package, output, members,
                          fmt::format("alternative {} {} \"{}\"{}", arguments.index,
                                      arguments.edit.dryRun ? "would be called" : "is called", printable(arguments.name),
                                      backup.empty() ? "" : ", the old names are in " + printable(backup)));

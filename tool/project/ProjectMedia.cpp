@@ -2,14 +2,11 @@
 
 #include "tool/project/ProjectPackage.h"
 #include "tool/shared/output/Failure.h"
+#include "tool/shared/output/JsonWriter.h"
 #include "tool/shared/output/Table.h"
-
-#include <nlohmann/json.hpp>
 
 #include <algorithm>
 #include <filesystem>
-
-using nlohmann::ordered_json;
 
 namespace {
 
@@ -45,7 +42,8 @@ void printProjectMedia(const std::string& path, ProjectInformation& project, std
     if (alternative)
         alternativeOf(project, alternative); // or it says that there is none
     std::vector<std::vector<std::string>> rows;
-    ordered_json media = ordered_json::array();
+    JsonWriter media;
+    media.beginArray();
     for (const ProjectMediaList& list : kProjectMediaLists) {
         const ProjectFileSet files = alternative ? project.filesUsedByVariantIndex(list.kind, *alternative)
                                                  : project.filesUsedByAnyVariant(list.kind);
@@ -56,13 +54,19 @@ void printProjectMedia(const std::string& path, ProjectInformation& project, std
             if (exists && onlyMissing)
                 continue;
             if (options.json)
-                media.push_back({{"key", list.key}, {"file", file}, {"exists", exists}});
+                media.beginObject().member("key", list.key).member("file", file).member("exists", exists).endObject();
             else
                 rows.push_back({list.name, exists ? "" : "missing", printable(file)});
         }
     }
     if (options.json)
-        Output::standard().print("{}\n", jsonText({{"path", path}, {"media", std::move(media)}}));
+        JsonWriter(Output::standard())
+            .beginObject()
+            .member("path", path)
+            .key("media")
+            .writeJson(media.endArray().text())
+            .endObject()
+            .endLine();
     printRows(rows, {{"KIND"}, {"STATE"}, {"FILE"}}, options);
 }
 
@@ -72,7 +76,8 @@ void printProjectDirectories(const std::string& path, const CFileRef& base, std:
     const auto project = ProjectInformation::initWithProjectURL(base.URL());
     const long index = alternative.value_or(project ? std::max(project->lastActiveVariation(), 0L) : 0);
     std::vector<std::vector<std::string>> rows;
-    ordered_json directories = ordered_json::array();
+    JsonWriter directories;
+    directories.beginArray();
     for (int value = 0; value < kDirectoryCount; ++value) {
         const auto ask = [&](bool creates) {
             return GetProjectDirectoryRefForBase(base, static_cast<TTypeDir_Prj>(value), creates,
@@ -85,14 +90,23 @@ void printProjectDirectories(const std::string& path, const CFileRef& base, std:
             throw Failure("this folder cannot be created: " + std::string(directory));
         const bool exists = directory.IsFolder();
         if (options.json)
-            directories.push_back({{"type", value}, {"directory", std::string(directory)}, {"exists", exists}});
+            directories.beginObject()
+                .member("type", value)
+                .member("directory", std::string(directory))
+                .member("exists", exists)
+                .endObject();
         else
             rows.push_back({std::to_string(value), exists ? "" : "missing", printable(std::string(directory))});
     }
     if (options.json)
-        Output::standard().print("{}\n", jsonText({{"path", path},
-                                                   {"directoryType", static_cast<int>(GetProjectDirectoryType(base))},
-                                                   {"layout", static_cast<int>(GetProjectLayout(base))},
-                                                   {"directories", std::move(directories)}}));
+        JsonWriter(Output::standard())
+            .beginObject()
+            .member("path", path)
+            .member("directoryType", static_cast<int>(GetProjectDirectoryType(base)))
+            .member("layout", static_cast<int>(GetProjectLayout(base)))
+            .key("directories")
+            .writeJson(directories.endArray().text())
+            .endObject()
+            .endLine();
     printRows(rows, {{"TYPE", Align::right}, {"STATE"}, {"FOLDER"}}, options);
 }

@@ -1,18 +1,13 @@
 #include "tool/project/ProjectReport.h"
 
 #include "tool/project/ProjectPackage.h"
-
-#include <nlohmann/json.hpp>
+#include "tool/shared/output/ClockTime.h"
+#include "tool/shared/output/JsonWriter.h"
 
 #include <charconv>
-#include <ctime>
 #include <filesystem>
 
-using nlohmann::ordered_json;
-
 namespace {
-
-constexpr double kUnixTimeOf2001 = 978307200;
 
 /// How many files of a kind an alternative uses, and how many of them are not there.
 struct MediaCount {
@@ -29,20 +24,6 @@ struct AlternativeReport {
     std::vector<ProjectBackup> backups;
     std::optional<InterruptedProjectExchange> interrupted;
 };
-
-std::string base64(const Bytes& bytes)
-{
-    constexpr char digits[] = "ABCDEFGHIJKLMNOPQRSTUVWXYZabcdefghijklmnopqrstuvwxyz0123456789+/";
-    std::string text;
-    for (std::size_t i = 0; i < bytes.size(); i += 3) {
-        unsigned group = 0;
-        for (std::size_t j = 0; j < 3; ++j)
-            group = group << 8 | (i + j < bytes.size() ? std::to_integer<unsigned>(bytes[i + j]) : 0);
-        for (std::size_t j = 0; j < 4; ++j)
-            text += i + j > bytes.size() ? '=' : digits[group >> (18 - 6 * j) & 63];
-    }
-    return text;
-}
 
 AlternativeReport reportOf(ProjectInformation& project, const std::string& key)
 {
@@ -70,25 +51,32 @@ AlternativeReport reportOf(ProjectInformation& project, const std::string& key)
     return report;
 }
 
-ordered_json jsonOf(ProjectInformation& project, const AlternativeReport& report)
+void writeJson(JsonWriter& json, ProjectInformation& project, const AlternativeReport& report)
 {
-    ordered_json object{{"key", report.key}, {"name", report.name}, {"active", report.isActive}};
-    if (!report.index)
-        return object;
-    object["index"] = *report.index;
-    const platform::Dictionary* metaData = project.loadMetaDataForVariant(*report.index);
-    object["metaData"] = metaData != nullptr ? projectJson(*metaData) : ordered_json();
-    object["media"] = ordered_json::array();
-    for (const MediaCount& media : report.media)
-        object["media"].push_back({{"key", media.list->key}, {"count", media.count}, {"missing", media.missing}});
-    object["backups"] = ordered_json::array();
-    for (const ProjectBackup& backup : report.backups)
-        object["backups"].push_back({{"name", backupName(backup.url)}, {"date", dateText(backup.date)}});
-    if (report.interrupted)
-        object["interruptedExchange"] = report.interrupted->backupURL
-                                            ? ordered_json(backupName(*report.interrupted, project, *report.index))
-                                            : ordered_json();
-    return object;
+    json.beginObject();
+    json.member("key", report.key).member("name", report.name).member("active", report.isActive);
+    if (report.index) {
+        json.member("index", *report.index);
+        const platform::Dictionary* metaData = project.loadMetaDataForVariant(*report.index);
+        json.member("metaData", metaData != nullptr ? platform::Value(*metaData) : platform::Value());
+        json.key("media").beginArray();
+        for (const MediaCount& media : report.media)
+            json.beginObject()
+                .member("key", media.list->key)
+                .member("count", media.count)
+                .member("missing", media.missing)
+                .endObject();
+        json.endArray();
+        json.key("backups").beginArray();
+        for (const ProjectBackup& backup : report.backups)
+            json.beginObject().member("name", backupName(backup.url)).member("date", dateText(backup.date)).endObject();
+        json.endArray();
+        if (const auto& exchange = report.interrupted)
+            json.member("interruptedExchange", exchange->backupURL
+                                                   ? std::optional(backupName(*exchange, project, *report.index))
+                                                   : std::nullopt);
+    }
+    json.endObject();
 }
 
 /// "120 BPM, C# minor, 4/4, 24 tracks, 48 kHz", as far as it is known.
@@ -152,52 +140,17 @@ void printLine(const AlternativeReport& report, ProjectInformation& project)
 
 } // namespace
 
-std::string dateText(platform::Date date)
-{
-    const double seconds = date.secondsSince2001 + kUnixTimeOf2001;
-    std::tm parts = {};
-    char text[32];
-    const auto time = static_cast<std::time_t>(std::abs(seconds) < 1e12 ? std::floor(seconds) : 0);
-    if (::gmtime_r(&time, &parts) == nullptr || std::strftime(text, sizeof text, "%Y-%m-%dT%H:%M:%SZ", &parts) == 0)
-        return {};
-    return text;
-}
-
-ordered_json projectJson(const platform::Value& value)
-{
-    const auto one = [](const auto& content) -> ordered_json {
-        using Content = std::decay_t<decltype(content)>;
-        if constexpr (std::is_same_v<Content, std::monostate>) {
-            return nullptr;
-        } else if constexpr (std::is_same_v<Content, Bytes>) {
-            return base64(content);
-        } else if constexpr (std::is_same_v<Content, platform::Date>) {
-            return dateText(content);
-        } else if constexpr (std::is_same_v<Content, platform::Array>) {
-            ordered_json array = ordered_json::array();
-            for (const platform::Value& element : content)
-                array.push_back(projectJson(element));
-            return array;
-        } else if constexpr (std::is_same_v<Content, platform::Dictionary>) {
-            ordered_json object = ordered_json::object();
-            for (const auto& [key, element] : content)
-                object[key] = projectJson(element);
-            return object;
-        } else {
-            return content;
-        }
-    };
-    return std::visit(one, value.variant());
-}
-
 void printProject(const std::string& path, ProjectInformation& project, const OutputOptions& options)
 {
     const Form form = outputForm(options);
     Output& output = Output::standard();
     if (form == Form::none)
         return;
-    ordered_json alternatives = ordered_json::array();
-    if (form == Form::table) {
+    JsonWriter json(output);
+    if (form == Form::json) {
+        json.beginObject().member("path", path).member("projectInfo", platform::Value(project.projectInfo()));
+        json.key("alternatives").beginArray();
+    } else if (form == Form::table) {
         const auto version = project.projectInfo().find(std::string_view(ProjectInfoKey::bundleVersion));
         const auto* number = version != project.projectInfo().end() ? version->second.get<std::int64_t>() : nullptr;
         const auto* savedFrom = platform::find<std::string>(project.projectInfo(), ProjectInfoKey::lastSavedFrom);
@@ -208,25 +161,24 @@ void printProject(const std::string& path, ProjectInformation& project, const Ou
     for (const std::string& key : project.variationIndexesSorted()) {
         const AlternativeReport report = reportOf(project, key);
         if (form == Form::json)
-            alternatives.push_back(jsonOf(project, report));
+            writeJson(json, project, report);
         else if (form == Form::table)
             printTable(report, project, usesColor(options.color));
         else
             printLine(report, project);
     }
     if (form == Form::json)
-        output.print("{}\n", jsonText({{"path", path},
-                                       {"projectInfo", projectJson(project.projectInfo())},
-                                       {"alternatives", std::move(alternatives)}}));
+        json.endArray().endObject().endLine();
 }
 
-void printProjectEdit(const std::string& path, const OutputOptions& options, const ordered_json& json,
+void printProjectEdit(const std::string& path, const OutputOptions& options, const ProjectMembers& members,
                       const std::string& sentence)
 {
     if (options.json) {
-        ordered_json object{{"path", path}};
-        object.update(json);
-        Output::standard().print("{}\n", jsonText(object));
+        JsonWriter json(Output::standard());
+        json.beginObject().member("path", path);
+        members(json);
+        json.endObject().endLine();
     } else if (!options.quiet) {
         Output::standard().print("{}: {}\n", printable(path), sentence);
     }

@@ -4,10 +4,10 @@
 #include "tool/project/ProjectPackage.h"
 #include "tool/project/ProjectReport.h"
 #include "tool/shared/output/Failure.h"
+#include "tool/shared/output/JsonWriter.h"
 #include "tool/shared/output/Terminal.h"
 
 #include <fmt/format.h>
-#include <nlohmann/json.hpp>
 
 #include <filesystem>
 #include <system_error>
@@ -69,11 +69,13 @@ void restoreBackup(const ProjectArguments& arguments, const OutputOptions& outpu
         sentence += fmt::format("alternative {} {} the data of backup {}, which {} what the alternative had",
                                 alternative, arguments.edit.dryRun ? "would have" : "has", backupName(backup),
                                 arguments.edit.dryRun ? "would have" : "has");
-        nlohmann::ordered_json json{
-            {"alternative", alternative}, {"backup", backupName(backup)}, {"dryRun", arguments.edit.dryRun}};
-        if (interrupted)
-            json["interruptedExchange"] = backupName(*interrupted, *project, alternative);
-        printProjectEdit(arguments.package, output, json, printable(sentence));
+        const auto members = [&](JsonWriter& json) {
+            json.member("alternative", alternative).member("backup", backupName(backup));
+            json.member("dryRun", arguments.edit.dryRun);
+            if (interrupted)
+                json.member("interruptedExchange", backupName(*interrupted, *project, alternative));
+        };
+        printProjectEdit(arguments.package, output, members, printable(sentence));
     });
 }
 
@@ -101,10 +103,12 @@ void settleExchange(const ProjectArguments& arguments, const OutputOptions& outp
                                           project->projectURL(), alternative, how, with, &error))
             throw Failure(error.description);
         const char* const done = arguments.forget ? "forgotten" : arguments.undo ? "undone" : "completed";
-        nlohmann::ordered_json json{{"alternative", alternative}, {"settled", done}, {"dryRun", arguments.edit.dryRun}};
-        if (!backup.empty())
-            json["backup"] = backup;
-        printProjectEdit(arguments.package, output, json,
+        const auto members = [&](JsonWriter& json) {
+            json.member("alternative", alternative).member("settled", done).member("dryRun", arguments.edit.dryRun);
+            if (!backup.empty())
+                json.member("backup", backup);
+        };
+        printProjectEdit(arguments.package, output, members,
                          fmt::format("the exchange of alternative {} with {} {} {}", alternative,
                                      backup.empty() ? "an unknown backup" : "backup " + printable(backup),
                                      arguments.edit.dryRun ? "would be" : "is", done));

@@ -3,8 +3,6 @@
 #include "tool/shared/looptags/LoopTags.h"
 #include "tool/shared/output/Failure.h"
 
-#include <nlohmann/json.hpp>
-
 #include <algorithm>
 #include <cctype>
 #include <iterator>
@@ -45,32 +43,42 @@ void appendField(std::string& line, std::string_view bytes)
     line += '"';
 }
 
-// Numbers as they are, lists joined with commas, of chunks the ids.
-std::string fieldText(const nlohmann::ordered_json& value)
+// Numbers as they are, lists joined with commas.
+std::string fieldText(const platform::Value& value)
 {
-    if (value.is_string())
-        return value.get<std::string>();
-    if (value.is_object())
-        return value.at("id").get<std::string>();
-    if (!value.is_array())
-        return value.dump();
+    if (const auto* text = value.get<std::string>())
+        return *text;
+    if (const auto* list = value.get<platform::Array>()) {
+        std::string joined;
+        for (const platform::Value& each : *list)
+            joined += (joined.empty() ? "" : ",") + fieldText(each);
+        return joined;
+    }
+    JsonWriter number;
+    number.write(value);
+    return std::string(number.text());
+}
+
+std::string chunkIds(const LoopTags& tags)
+{
     std::string joined;
-    for (const auto& each : value)
-        joined += (joined.empty() ? "" : ",") + fieldText(each);
+    for (const LoopTags::Chunk& chunk : tags.chunks)
+        joined += (joined.empty() ? "" : ",") + chunk.id;
     return joined;
 }
 
 std::string csvLine(const std::string& path, const LoopTags& tags)
 {
-    nlohmann::ordered_json values = tagsWithoutTransients(tags);
-    values["fileType"] = fourCCText(tags.fileType);
-    values["transients"] = tags.transients.size();
+    std::vector<TagValue> values = tagValues(tags);
+    values.push_back({"fileType", fourCCText(tags.fileType)});
+    values.push_back({"transients", tags.transients.size()});
+    values.push_back({"chunks", chunkIds(tags)});
     std::string line;
     appendField(line, path);
     for (const char* column : std::span(kColumns).subspan(1)) {
         line += ',';
-        if (const auto found = values.find(column); found != values.end())
-            appendField(line, fieldText(*found));
+        if (const auto found = std::ranges::find(values, column, &TagValue::name); found != values.end())
+            appendField(line, fieldText(found->value));
     }
     return line + "\r\n";
 }
@@ -88,7 +96,9 @@ void fill(ScanRecord& record, const LoopTags& tags, ScanForm form)
 {
     record.kind = ScanRecord::loop;
     if (form == ScanForm::json) {
-        record.text = loopTagsJson(record.path, tags);
+        JsonWriter json;
+        writeLoopTags(json, record.path, tags);
+        record.text = json.text();
     } else if (form == ScanForm::csv) {
         record.text = csvLine(record.path, tags);
     } else if (form == ScanForm::table) {
@@ -177,12 +187,13 @@ void ScanWriter::add(const ScanRecord& record)
         return;
     }
     if (form_ == ScanForm::json)
-        output_.write(first ? "[\n" : ",\n");
-    output_.write(record.text);
+        json_.next().writeJson(record.text);
+    else
+        output_.write(record.text);
 }
 
 void ScanWriter::finish()
 {
     if (form_ == ScanForm::json)
-        output_.write(first_ ? "[]\n" : "\n]\n");
+        json_.finish();
 }

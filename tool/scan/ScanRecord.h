@@ -1,7 +1,7 @@
 // One file of a scan: read by any thread and put into the form of the output, then written in order.
 #pragma once
 
-#include "tool/shared/output/Output.h"
+#include "tool/shared/output/JsonRecords.h"
 #include "tool/shared/output/Table.h"
 
 #include <string>
@@ -42,4 +42,5 @@ private:
     bool first_ = true;
     Table table_;
     Output& output_ = Output::standard();
+    JsonRecords json_;
 };

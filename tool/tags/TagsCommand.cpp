@@ -5,8 +5,7 @@
 #include "tool/shared/input/FileByFile.h"
 #include "tool/shared/looptags/LoopTags.h"
 #include "tool/shared/output/Failure.h"
-
-#include <nlohmann/json.hpp>
+#include "tool/shared/output/JsonRecords.h"
 
 namespace {
 
@@ -24,7 +23,7 @@ public:
     void add(const std::string& path, const LoopTags& tags)
     {
         if (form_ == Form::json)
-            addJson(loopTagsJson(path, tags));
+            writeLoopTags(json_.next(), path, tags);
         else if (form_ == Form::table)
             addTable(path, tags);
         else if (form_ == Form::lines)
@@ -37,23 +36,16 @@ public:
     void addFailure(const std::string& path, const std::string& text)
     {
         if (form_ == Form::json)
-            addJson(jsonText({{"path", path}, {"error", text}}));
-        first_ = first_ && form_ != Form::json;
+            json_.addFailure(path, text);
     }
 
     void finish()
     {
         if (form_ == Form::json)
-            output_.print("{}]\n", first_ ? "[" : "\n");
+            json_.finish();
     }
 
 private:
-    void addJson(std::string_view object)
-    {
-        output_.write(first_ ? "[\n" : ",\n");
-        output_.write(object);
-    }
-
     void addTable(const std::string& path, const LoopTags& tags)
     {
         constexpr int kLabelWidth = 12;
@@ -72,6 +64,7 @@ private:
     bool several_;
     bool first_ = true;
     Output& output_ = Output::standard();
+    JsonRecords json_;
 };
 
 bool runTags(const std::vector<std::string>& files, const OutputOptions& options)

@@ -5,9 +5,8 @@
 #include "loops/VireoLoopUserDataUtils.h"
 #include "tool/shared/input/InputFile.h"
 #include "tool/shared/looptags/LoopTagFields.h"
+#include "tool/shared/output/JsonWriter.h"
 #include "tool/shared/output/Output.h"
-
-#include <nlohmann/json.hpp>
 
 #include <algorithm>
 #include <cmath>
@@ -161,19 +160,6 @@ const ShownTag kShownTags[] = {
     {"chunks", "Chunks", chunksText},
 };
 
-nlohmann::ordered_json jsonValue(const platform::Value& value)
-{
-    if (const auto* number = value.get<std::int64_t>())
-        return *number;
-    if (const auto* text = value.get<std::string>())
-        return *text;
-    auto list = nlohmann::ordered_json::array();
-    if (const auto* values = value.get<platform::Array>())
-        for (const platform::Value& each : *values)
-            list.push_back(jsonValue(each));
-    return list;
-}
-
 } // namespace
 
 std::int64_t LoopTags::number(std::string_view key) const
@@ -279,36 +265,36 @@ std::string tagText(const LoopTags& tags, const char* name)
     return shown->text(tags);
 }
 
-nlohmann::ordered_json tagsWithoutTransients(const LoopTags& tags)
+std::vector<TagValue> tagValues(const LoopTags& tags)
 {
-    nlohmann::ordered_json json = nlohmann::ordered_json::object();
+    std::vector<TagValue> present;
     for (const TagField& field : tagFields()) {
         const platform::Dictionary& values = field.isFileInfo ? tags.info : tags.combined;
         const auto found = field.key != nullptr ? values.find(field.key) : values.end();
         if (found != values.end())
-            json[field.name] = jsonValue(found->second);
+            present.push_back({field.name, found->second});
     }
     if (const double tempo = tags.tempo(); tempo > 0)
-        json["tempo"] = tempo;
-    for (const LoopTags::Chunk& chunk : tags.chunks)
-        json["chunks"].push_back({{"id", chunk.id}, {"size", chunk.size}});
-    return json;
+        present.push_back({"tempo", tempo});
+    return present;
 }
 
-std::string loopTagsJson(const std::string& path, const LoopTags& tags)
+void writeLoopTags(JsonWriter& json, const std::string& path, const LoopTags& tags)
 {
-    nlohmann::ordered_json json{{"path", path}, {"fileType", fourCCText(tags.fileType)}};
-    json.update(tagsWithoutTransients(tags));
-    std::string text = jsonText(json);
-    if (tags.transients.empty())
-        return text;
-    text.pop_back(); // "}"
-    text += ",\"transients\":";
-    char separator = '[';
-    for (const VireoLoopTransient& transient : tags.transients) {
-        fmt::format_to(std::back_inserter(text), "{}{{\"type\":{},\"frame\":{}}}", separator, transient.transientType(),
-                       transient.frame());
-        separator = ',';
+    json.beginObject().member("path", path).member("fileType", fourCCText(tags.fileType));
+    for (const TagValue& tag : tagValues(tags))
+        json.member(tag.name, tag.value);
+    if (!tags.chunks.empty()) {
+        json.key("chunks").beginArray();
+        for (const LoopTags::Chunk& chunk : tags.chunks)
+            json.beginObject().member("id", chunk.id).member("size", chunk.size).endObject();
+        json.endArray();
     }
-    return text + "]}";
+    if (!tags.transients.empty()) { // there may be millions
+        json.key("transients").beginArray();
+        for (const VireoLoopTransient& transient : tags.transients)
+            json.beginObject().member("type", transient.transientType()).member("frame", transient.frame()).endObject();
+        json.endArray();
+    }
+    json.endObject();
 }

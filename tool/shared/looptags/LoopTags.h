@@ -5,12 +5,12 @@
 #include "platform/core/Value.h"
 #include "tool/shared/output/Failure.h"
 
-#include <nlohmann/json_fwd.hpp>
-
 #include <cstdint>
 #include <string>
 #include <string_view>
 #include <vector>
+
+class JsonWriter;
 
 /// Plain values; nothing of the file stays open.
 struct LoopTags {
@@ -71,7 +71,12 @@ std::string tagText(const LoopTags& tags, const char* name);
 /// "AIFF" or "CAF".
 const char* loopContainerName(FourCC fileType);
 
-/// The JSON members of all tags that are present, without the transients, of which there may be millions.
-nlohmann::ordered_json tagsWithoutTransients(const LoopTags& tags);
+/// A tag by the name that JSON has for it: a number, a text or a list.
+struct TagValue {
+    std::string name;
+    platform::Value value;
+};
+/// All tags that are present, in the order of output; not the transients and the chunks.
+std::vector<TagValue> tagValues(const LoopTags& tags);
 /// The whole JSON object, on one line.
-std::string loopTagsJson(const std::string& path, const LoopTags& tags);
+void writeLoopTags(JsonWriter& json, const std::string& path, const LoopTags& tags);

@@ -3,58 +3,61 @@
 #include "tool/shared/access/FileAccess.h"
 #include "tool/shared/looptags/LoopTagFields.h"
 #include "tool/shared/output/Failure.h"
+#include "tool/shared/output/JsonRecords.h"
 #include "tool/shared/output/Terminal.h"
 
 #include <algorithm>
 
-using nlohmann::ordered_json;
-using platform::Dictionary;
+using platform::Value;
 
 namespace {
 
-bool isNothing(const ordered_json& value)
+const Value* find(const std::vector<TagValue>& tags, const std::string& name)
 {
-    return value.is_null() || value == 0 || (value.is_string() && value.get_ref<const std::string&>().empty()) ||
-           (value.is_array() && std::all_of(value.begin(), value.end(), isNothing));
+    const auto found = std::ranges::find(tags, name, &TagValue::name);
+    return found != tags.end() ? &found->value : nullptr;
 }
 
 // Every member once, in the order of `after`, then what only `before` has.
-void addDifferences(const ordered_json& before, const ordered_json& after, std::vector<TagChange>& changes)
+void addDifferences(const std::vector<TagValue>& before, const std::vector<TagValue>& after,
+                    std::vector<TagChange>& changes)
 {
-    for (const auto& [key, to] : after.items()) {
-        const ordered_json from = before.value(key, ordered_json());
-        if (from != to && !(isNothing(from) && isNothing(to)))
-            changes.push_back({key, isNothing(from) ? ordered_json() : from, isNothing(to) ? ordered_json() : to});
+    for (const auto& [name, to] : after) {
+        const Value* const known = find(before, name);
+        const Value from = known != nullptr ? *known : Value();
+        if (from != to && !(isAbsent(from) && isAbsent(to)))
+            changes.push_back({name, isAbsent(from) ? Value() : from, isAbsent(to) ? Value() : to});
     }
-    for (const auto& [key, from] : before.items())
-        if (!after.contains(key) && !isNothing(from))
-            changes.push_back({key, from, {}});
+    for (const auto& [name, from] : before)
+        if (find(after, name) == nullptr && !isAbsent(from))
+            changes.push_back({name, from, {}});
 }
 
-ordered_json countOf(const std::vector<VireoLoopTransient>& transients)
+Value countOf(const std::vector<VireoLoopTransient>& transients)
 {
-    return transients.empty() ? ordered_json() : ordered_json(transients.size());
+    return transients.empty() ? Value() : Value(transients.size());
 }
 
-ordered_json chunkSizes(const LoopTags& tags)
+std::vector<TagValue> chunkSizes(const LoopTags& tags)
 {
-    ordered_json sizes = ordered_json::object();
+    std::vector<TagValue> sizes;
     for (const LoopTags::Chunk& chunk : tags.chunks)
-        sizes[chunk.id] = fmt::format("{} bytes", chunk.size);
+        sizes.push_back({chunk.id, fmt::format("{} bytes", chunk.size)});
     return sizes;
 }
 
-std::string inWords(const ordered_json& value)
+std::string inWords(const Value& value)
 {
-    if (value.is_string())
-        return value.get<std::string>();
-    if (value.is_number_float())
-        return fmt::format("{:.6g}", value.get<double>());
-    if (!value.is_array())
-        return value.is_null() ? "" : value.dump();
+    if (const auto* text = value.get<std::string>())
+        return *text;
+    if (const auto* number = value.get<std::int64_t>())
+        return std::to_string(*number);
+    if (const auto* number = value.get<double>())
+        return fmt::format("{:.6g}", *number);
     std::string joined;
-    for (const ordered_json& each : value)
-        joined += (joined.empty() ? "" : ",") + inWords(each);
+    if (const auto* list = value.get<platform::Array>())
+        for (const Value& each : *list)
+            joined += (joined.empty() ? "" : ",") + inWords(each);
     return joined;
 }
 
@@ -63,9 +66,9 @@ std::string inWords(const std::vector<TagChange>& changes)
     std::string text;
     for (const TagChange& change : changes) {
         text += (text.empty() ? "" : ", ") + change.key;
-        if (!change.to.is_null())
+        if (!change.to.isNull())
             text += "=" + inWords(change.to);
-        if (!change.from.is_null() && change.from != change.to)
+        if (!change.from.isNull() && change.from != change.to)
             text += " (was " + inWords(change.from) + ")";
     }
     return text;
@@ -91,14 +94,14 @@ public:
     void addFailure(const std::string& path, const std::string& text)
     {
         if (output_.json)
-            addJson({{"path", path}, {"error", text}});
+            json_.addFailure(path, text);
         reportFailure(path, text);
     }
 
     void finish()
     {
         if (output_.json)
-            Output::standard().print("{}]\n", first_ ? "[" : "\n");
+            json_.finish();
     }
 
 private:
@@ -116,26 +119,28 @@ private:
 
     void addJson(const std::string& path, const TagsPlan& plan, const std::string& backup)
     {
-        ordered_json json{{"path", path}, {"action", editor_.action}, {"changes", ordered_json::array()}};
+        JsonWriter& json = json_.next();
+        json.beginObject().member("path", path).member("action", editor_.action);
+        json.key("changes").beginArray();
         for (const TagChange& change : plan.changes)
-            json["changes"].push_back({{"key", change.key}, {"from", change.from}, {"to", change.to}});
+            json.beginObject()
+                .member("key", change.key)
+                .member("from", change.from)
+                .member("to", change.to)
+                .endObject();
+        json.endArray();
         if (!plan.notKept.empty())
-            json["notKept"] = plan.notKept;
-        json["dryRun"] = edit_.dryRun;
+            json.member("notKept", plan.notKept);
+        json.member("dryRun", edit_.dryRun);
         if (!backup.empty())
-            json["backup"] = backup;
-        addJson(json);
-    }
-
-    void addJson(const ordered_json& json)
-    {
-        Output::standard().print("{}{}", std::exchange(first_, false) ? "[\n" : ",\n", jsonText(json));
+            json.member("backup", backup);
+        json.endObject();
     }
 
     const TagsEditor& editor_;
     const EditOptions& edit_;
     const OutputOptions& output_;
-    bool first_ = true;
+    JsonRecords json_;
 };
 
 void editFile(const std::string& path, const TagsEditor& editor, const EditOptions& options, EditReport& report)
@@ -154,6 +159,8 @@ bool isAbsent(const platform::Value& value)
 {
     if (const auto* number = value.get<std::int64_t>())
         return *number == 0;
+    if (const auto* number = value.get<double>())
+        return *number == 0;
     if (const auto* text = value.get<std::string>())
         return text->empty();
     const auto* list = value.get<platform::Array>();
@@ -162,12 +169,8 @@ bool isAbsent(const platform::Value& value)
 
 std::vector<TagChange> differences(const LoopTags& before, const LoopTags& after)
 {
-    ordered_json from = tagsWithoutTransients(before);
-    ordered_json to = tagsWithoutTransients(after);
-    from.erase("chunks");
-    to.erase("chunks");
     std::vector<TagChange> changes;
-    addDifferences(from, to, changes);
+    addDifferences(tagValues(before), tagValues(after), changes);
     if (before.transients != after.transients)
         changes.push_back({"transients", countOf(before.transients), countOf(after.transients)});
     addDifferences(chunkSizes(before), chunkSizes(after), changes);

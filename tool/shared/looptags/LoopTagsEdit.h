@@ -7,8 +7,6 @@
 #include "tool/shared/looptags/RawLoopTags.h"
 #include "tool/shared/output/Output.h"
 
-#include <nlohmann/json.hpp>
-
 #include <functional>
 #include <string>
 #include <vector>
@@ -17,8 +15,8 @@
 /// given by their sizes, transients by their number.
 struct TagChange {
     std::string key;
-    nlohmann::ordered_json from;
-    nlohmann::ordered_json to;
+    platform::Value from;
+    platform::Value to;
 };
 
 /// An edit of one file, worked out.

@@ -6,6 +6,8 @@
 #include <charconv>
 #include <cmath>
 #include <cstdint>
+#include <cstdlib>
+#include <ctime>
 #include <string_view>
 
 std::string clockText(double seconds, int decimals, ShowHours showHours)
@@ -64,4 +66,16 @@ std::optional<SoundLength> soundLengthFromText(const std::string& text)
     const char* const end = text.data() + text.size();
     const auto [rest, error] = std::from_chars(text.data(), end, length.frames);
     return error == std::errc() && rest == end ? std::optional(length) : std::nullopt;
+}
+
+std::string dateText(platform::Date date)
+{
+    constexpr double kUnixTimeOf2001 = 978307200;
+    const double seconds = date.secondsSince2001 + kUnixTimeOf2001;
+    std::tm parts = {};
+    char text[32];
+    const auto time = static_cast<std::time_t>(std::abs(seconds) < 1e12 ? std::floor(seconds) : 0);
+    if (::gmtime_r(&time, &parts) == nullptr || std::strftime(text, sizeof text, "%Y-%m-%dT%H:%M:%SZ", &parts) == 0)
+        return {};
+    return text;
 }

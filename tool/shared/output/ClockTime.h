@@ -1,6 +1,8 @@
 // Points in time as people write them: "1:02:03.456".
 #pragma once
 
+#include "platform/core/Value.h"
+
 #include <cstdint>
 #include <optional>
 #include <string>
@@ -27,3 +29,6 @@ struct SoundLength {
 /// A number of frames such as "48000", or a time, which shows that it is one: "1.5s", "1:02.5", "1:02:03.5". None for
 /// another text.
 std::optional<SoundLength> soundLengthFromText(const std::string& text);
+
+/// "2026-11-21T09:30:00Z"; empty for a date that the calendar does not reach.
+std::string dateText(platform::Date date);

@@ -1,27 +1,127 @@
 #include "tool/shared/output/JsonWriter.h"
 
-#include <nlohmann/json.hpp>
+#include "tool/shared/output/ClockTime.h"
+#include "tool/shared/output/UnseenCharacters.h"
 
 #include <algorithm>
 
-void JsonWriter::write(std::string_view text)
+namespace {
+
+struct Character {
+    char32_t code;
+    std::size_t length; // of its bytes
+};
+
+// The first character of UTF-8; U+FFFD for a byte that begins none, and for the beginning of one that is not whole (The
+// Unicode Standard, table 3-7, and section 3.9 on maximal subparts).
+Character firstCharacter(std::string_view text)
+{
+    const auto byteAt = [text](std::size_t i) { return static_cast<unsigned char>(text[i]); };
+    const unsigned lead = byteAt(0);
+    if (lead < 0x80)
+        return {lead, 1};
+    if (lead < 0xC2 || lead > 0xF4)
+        return {0xFFFD, 1};
+    const std::size_t length = lead < 0xE0 ? 2 : lead < 0xF0 ? 3 : 4;
+    char32_t code = lead & (0x7FU >> length);
+    for (std::size_t i = 1; i < length; ++i) {
+        const unsigned least = i > 1 ? 0x80 : lead == 0xE0 ? 0xA0 : lead == 0xF0 ? 0x90 : 0x80;
+        const unsigned most = i > 1 ? 0xBF : lead == 0xED ? 0x9F : lead == 0xF4 ? 0x8F : 0xBF;
+        if (i == text.size() || byteAt(i) < least || byteAt(i) > most)
+            return {0xFFFD, i};
+        code = code << 6 | (byteAt(i) & 0x3FU);
+    }
+    return {code, length};
+}
+
+std::string base64(const Bytes& bytes)
+{
+    constexpr char digits[] = "ABCDEFGHIJKLMNOPQRSTUVWXYZabcdefghijklmnopqrstuvwxyz0123456789+/";
+    std::string text;
+    for (std::size_t i = 0; i < bytes.size(); i += 3) {
+        unsigned group = 0;
+        for (std::size_t j = 0; j < 3; ++j)
+            group = group << 8 | (i + j < bytes.size() ? std::to_integer<unsigned>(bytes[i + j]) : 0);
+        for (std::size_t j = 0; j < 4; ++j)
+            text += i + j > bytes.size() ? '=' : digits[group >> (18 - 6 * j) & 63];
+    }
+    return text;
+}
+
+} // namespace
+
+JsonWriter& JsonWriter::write(std::string_view text)
 {
     const bool isPlain =
         std::all_of(text.begin(), text.end(), [](char c) { return c >= 0x20 && c < 0x7F && c != '"' && c != '\\'; });
-    if (!isPlain) {
-        append(jsonText(text));
-        return;
-    }
     separate();
     put('"');
-    put(text);
+    if (isPlain)
+        put(text);
+    else
+        putEscaped(text);
     put('"');
     isFirst_ = false;
+    return *this;
 }
 
-bool JsonWriter::flush()
+void JsonWriter::putEscaped(std::string_view text)
 {
-    output_.write({buffer_.data(), used_});
-    used_ = 0;
-    return !output_.failed();
+    constexpr std::string_view kEscaped = "\"\\\b\f\n\r\t", kLetters = "\"\\bfnrt";
+    while (!text.empty()) {
+        const auto [code, length] = firstCharacter(text);
+        const std::string_view bytes = text.substr(0, length);
+        text.remove_prefix(length);
+        if (const std::size_t found = length == 1 ? kEscaped.find(bytes[0]) : kEscaped.npos; found != kEscaped.npos) {
+            put('\\');
+            put(kLetters[found]);
+        } else if (code >= 0x20 && !isLateControl(code) && !isUnseen(code)) {
+            put(code == 0xFFFD ? "\xEF\xBF\xBD" : bytes);
+        } else if (const auto number = static_cast<std::uint32_t>(code); number < 0x10000) {
+            put(fmt::format("\\u{:04x}", number));
+        } else { // as a pair of surrogates
+            put(fmt::format("\\u{:04x}\\u{:04x}", 0xD7C0 + (number >> 10), 0xDC00 + (number & 0x3FF)));
+        }
+    }
+}
+
+JsonWriter& JsonWriter::write(double value)
+{
+    if (!std::isfinite(value))
+        return writeNull();
+    constexpr double kLeast = 1e-4, kMost = 1e15; // others have an exponent
+    const double size = std::fabs(value);
+    const bool isFixed = size == 0 || (size >= kLeast && size < kMost);
+    char text[40];
+    const char* const end = std::to_chars(text, text + sizeof text, value,
+                                          isFixed ? std::chars_format::fixed : std::chars_format::scientific)
+                                .ptr;
+    const std::string_view number(text, static_cast<std::size_t>(end - text));
+    append(number);
+    if (isFixed && number.find('.') == number.npos)
+        put(".0");
+    return *this;
+}
+
+JsonWriter& JsonWriter::write(const platform::Value& value)
+{
+    const auto one = [this](const auto& content) {
+        using Content = std::decay_t<decltype(content)>;
+        if constexpr (std::is_same_v<Content, std::monostate>) {
+            writeNull();
+        } else if constexpr (std::is_same_v<Content, Bytes>) {
+            write(base64(content));
+        } else if constexpr (std::is_same_v<Content, platform::Date>) {
+            write(dateText(content));
+        } else if constexpr (std::is_same_v<Content, platform::Dictionary>) {
+            beginObject();
+            for (const auto& [key, element] : content)
+                member(key, element);
+            endObject();
+        } else {
+            write(content);
+        }
+    };
+    std::visit(one, value.variant());
+    return *this;
 }

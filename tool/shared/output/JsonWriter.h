@@ -1,6 +1,7 @@
-// JSON written as it comes, for what is too large to be held as a tree of values first.
+// All JSON that the command writes: as it comes, so that nothing is held as a tree of values first.
 #pragma once
 
+#include "platform/core/Value.h"
 #include "tool/shared/output/Output.h"
 
 #include <charconv>
@@ -13,113 +14,132 @@
 #include <string_view>
 #include <vector>
 
-/// Commas are its own business; what belongs where is the caller's.
+/// Commas and escapes are its own business; what belongs where is the caller's. Without line breaks but for those that
+/// are asked for.
 class JsonWriter {
 public:
-    explicit JsonWriter(Output& output) : output_(output) {}
+    explicit JsonWriter(Output& output) : buffer_(output.buffer_), output_(&output) {}
+    /// Keeps the text, for `text`.
+    JsonWriter() : buffer_(ownBuffer_) {}
     JsonWriter(const JsonWriter&) = delete;
     JsonWriter& operator=(const JsonWriter&) = delete;
-    ~JsonWriter() { flush(); }
+    std::string_view text() const { return {ownBuffer_.data(), ownBuffer_.size()}; }
 
-    void beginObject() { begin('{'); }
-    void endObject() { end('}'); }
-    void beginArray() { begin('['); }
-    void endArray() { end(']'); }
+    JsonWriter& beginObject() { return begin('{'); }
+    JsonWriter& endObject() { return end('}'); }
+    JsonWriter& beginArray() { return begin('['); }
+    JsonWriter& endArray() { return end(']'); }
+    /// Of an array whose elements began with `newLine`, if there are any.
+    JsonWriter& endArrayOfLines()
+    {
+        if (!isFirst_)
+            put('\n');
+        return end(']');
+    }
     /// A line of its own for what comes next, ahead of which no comma is missing any more.
-    void newLine()
+    JsonWriter& newLine()
     {
         separate();
         put('\n');
+        return *this;
+    }
+    /// Behind all.
+    JsonWriter& endLine()
+    {
+        put('\n');
+        isFirst_ = true;
+        return *this;
     }
 
-    void key(std::string_view name)
+    JsonWriter& key(std::string_view name)
     {
         write(name);
         put(':');
         isFirst_ = true;
+        return *this;
     }
     /// A key that is known when this is compiled must need no escapes.
     template <std::size_t size>
-    void key(const char (&name)[size])
+    JsonWriter& key(const char (&name)[size])
     {
         separate();
         char* to = room(size + 2);
         *to++ = '"';
         std::memcpy(to, name, size - 1);
         std::memcpy(to + size - 1, "\":", 2);
-        used_ += size + 2;
+        advance(size + 2);
+        return *this;
     }
     template <class Value>
-    void member(const auto& name, const Value& value)
+    JsonWriter& member(const auto& name, const Value& value)
     {
-        key(name);
-        write(value);
+        return key(name).write(value);
     }
 
-    void write(std::string_view text);
-    void write(const std::string& text) { write(std::string_view(text)); }
-    void write(std::integral auto value)
+    /// Bytes that are not UTF-8 become U+FFFD; what could not be seen is escaped.
+    JsonWriter& write(std::string_view text);
+    JsonWriter& write(const std::string& text) { return write(std::string_view(text)); }
+    JsonWriter& write(const char* text) { return write(std::string_view(text)); }
+    JsonWriter& write(std::integral auto value)
     {
         if constexpr (std::same_as<decltype(value), bool>)
-            append(value ? "true" : "false");
+            return append(value ? "true" : "false");
         else
-            append(value);
+            return append(value);
     }
     /// The shortest text that is read back as the same number; null for what is none.
-    void write(float value)
+    JsonWriter& write(float value)
     {
         if (const int whole = static_cast<int>(std::fabs(value) < 1000 ? value : 0); value == static_cast<float>(whole))
-            append(whole); // most are, and it is much quicker
-        else if (std::isfinite(value))
-            append(value);
-        else
-            append("null");
+            return append(whole); // most are, and it is much quicker
+        return std::isfinite(value) ? append(value) : writeNull();
     }
+    /// The same, with a fraction or an exponent always: 120.0 is no integer.
+    JsonWriter& write(double value);
+    JsonWriter& writeNull() { return append("null"); }
     template <class Value>
-    void write(const std::optional<Value>& value)
+    JsonWriter& write(const std::optional<Value>& value)
     {
-        if (value)
-            write(*value);
-        else
-            append("null");
+        return value ? write(*value) : writeNull();
     }
     template <class Value>
-    void write(const std::vector<Value>& values)
+    JsonWriter& write(const std::vector<Value>& values)
     {
         beginArray();
         for (const Value& value : values)
             write(value);
-        endArray();
+        return endArray();
     }
-
-    /// False when what was written goes nowhere: there is no use in writing on.
-    bool flush();
+    /// Data as base64, dates as ISO 8601 in UTC.
+    JsonWriter& write(const platform::Value& value);
+    /// What another writer kept.
+    JsonWriter& writeJson(std::string_view json) { return append(json); }
 
 private:
-    static constexpr std::size_t kBufferSize = 64 * 1024;
-
-    /// Where the next `size` bytes go, at most `kBufferSize`.
+    /// Where the next `size` bytes go.
     char* room(std::size_t size)
     {
-        if (size > kBufferSize - used_)
-            flush();
-        return buffer_.data() + used_;
+        if (output_ != nullptr && buffer_.size() + size > Output::kFlushSize)
+            output_->flush();
+        buffer_.try_reserve(buffer_.size() + size);
+        return buffer_.data() + buffer_.size();
     }
+    void advance(std::size_t size) { buffer_.try_resize(buffer_.size() + size); }
     void put(char character)
     {
         *room(1) = character;
-        ++used_;
+        advance(1);
     }
     void put(std::string_view text)
     {
-        if (text.size() > kBufferSize) {
-            flush();
-            output_.write(text);
+        if (output_ != nullptr && text.size() > Output::kFlushSize) {
+            output_->write(text);
             return;
         }
         std::memcpy(room(text.size()), text.data(), text.size());
-        used_ += text.size();
+        advance(text.size());
     }
+    void putEscaped(std::string_view text);
 
     void separate()
     {
@@ -127,35 +147,38 @@ private:
             put(',');
         isFirst_ = true;
     }
-    void begin(char bracket)
+    JsonWriter& begin(char bracket)
     {
         separate();
         put(bracket);
+        return *this;
     }
-    void end(char bracket)
+    JsonWriter& end(char bracket)
     {
         put(bracket);
         isFirst_ = false;
+        return *this;
     }
-    void append(std::string_view text)
+    JsonWriter& append(std::string_view text)
     {
         separate();
         put(text);
         isFirst_ = false;
+        return *this;
     }
     template <class Number>
-        requires std::integral<Number> || std::floating_point<Number>
-    void append(Number value)
+    requires std::integral<Number> || std::floating_point<Number> JsonWriter& append(Number value)
     {
         constexpr std::size_t longest = 40;
         separate();
         char* const to = room(longest);
-        used_ += static_cast<std::size_t>(std::to_chars(to, to + longest, value).ptr - to);
+        advance(static_cast<std::size_t>(std::to_chars(to, to + longest, value).ptr - to));
         isFirst_ = false;
+        return *this;
     }
 
-    Output& output_;
-    std::vector<char> buffer_ = std::vector<char>(kBufferSize);
-    std::size_t used_ = 0;
+    fmt::memory_buffer ownBuffer_;
+    fmt::memory_buffer& buffer_; // its own, or that of the output
+    Output* output_ = nullptr;
     bool isFirst_ = true; // no comma is needed ahead of what comes next
 };

@@ -1,9 +1,6 @@
 #include "tool/shared/output/Output.h"
 
 #include "tool/shared/output/Failure.h"
-#include "tool/shared/output/UnseenCharacters.h"
-
-#include <nlohmann/json.hpp>
 
 #include <cerrno>
 #include <poll.h>
@@ -62,9 +59,4 @@ bool Output::finish()
     if (failed() && error_ != EPIPE)
         reportFailure("standard output", systemErrorText(error_));
     return !failed();
-}
-
-std::string jsonText(const nlohmann::ordered_json& value)
-{
-    return withEscapes(value.dump(-1, ' ', false, nlohmann::ordered_json::error_handler_t::replace));
 }

@@ -4,7 +4,6 @@
 #include "tool/shared/output/Terminal.h"
 
 #include <fmt/format.h>
-#include <nlohmann/json_fwd.hpp>
 
 #include <iterator>
 #include <string>
@@ -43,12 +42,10 @@ public:
     bool finish();
 
 private:
+    friend class JsonWriter; // which formats in place
     static constexpr std::size_t kFlushSize = 64 * 1024;
     void writeThrough(std::string_view bytes);
 
     fmt::memory_buffer buffer_;
     int error_ = 0;
 };
-
-/// One line of JSON; bytes that are not UTF-8 become U+FFFD.
-std::string jsonText(const nlohmann::ordered_json& value);

@@ -1,7 +1,5 @@
 #include "tool/shared/output/UnseenCharacters.h"
 
-#include <fmt/format.h>
-
 #include <algorithm>
 #include <iterator>
 #include <utility>
@@ -11,11 +9,6 @@ namespace {
 bool isASCII(std::string_view text)
 {
     return std::ranges::all_of(text, [](char c) { return static_cast<unsigned char>(c) < 0x7F; });
-}
-
-bool isLateControl(char32_t character)
-{
-    return character >= 0x7F && character < 0xA0;
 }
 
 // Calls `visit` for each character of UTF-8 with its bytes; U+FFFD stands for a byte that belongs to none.
@@ -45,6 +38,11 @@ void forEachCharacter(std::string_view text, Visit visit)
 
 } // namespace
 
+bool isLateControl(char32_t character)
+{
+    return character >= 0x7F && character < 0xA0;
+}
+
 bool isUnseen(char32_t character)
 {
     constexpr std::pair<char32_t, char32_t> ranges[] = {{0x034F, 0x034F}, {0x061C, 0x061C}, {0x180E, 0x180E},
@@ -63,22 +61,4 @@ bool isMisleading(std::string_view text)
             found = found || (isLateControl(character) && character > 0x7F) || isUnseen(character);
         });
     return found;
-}
-
-std::string withEscapes(std::string json)
-{
-    if (isASCII(json)) // most is
-        return json;
-    std::string result;
-    forEachCharacter(json, [&](char32_t character, std::string_view bytes) {
-        const auto code = static_cast<std::uint32_t>(character);
-        if (!isLateControl(character) && !isUnseen(character))
-            result += bytes;
-        else if (code < 0x10000)
-            fmt::format_to(std::back_inserter(result), "\\u{:04x}", code);
-        else // as a pair of surrogates
-            fmt::format_to(std::back_inserter(result), "\\u{:04x}\\u{:04x}", 0xD7C0 + (code >> 10),
-                           0xDC00 + (code & 0x3FF));
-    });
-    return result;
 }

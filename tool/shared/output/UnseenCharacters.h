@@ -9,11 +9,11 @@
 /// are none, nor are controls.
 bool isUnseen(char32_t character);
 
+/// DEL and the C1 controls.
+bool isLateControl(char32_t character);
+
 /// Whether the text holds such a character or a C1 control. Bytes that are not UTF-8 are passed over.
 bool isMisleading(std::string_view text);
-
-/// JSON with such characters, DEL and C1 controls as escapes, which are equal to them.
-std::string withEscapes(std::string json);
 
 /// As `printable`, for standard error: whether that is a terminal, not standard output, decides what is escaped.
 std::string printableOnError(std::string_view text);

@@ -27,6 +27,8 @@ INSIDERS = {
     "platform/packets": {"platform/audio"},
     "platform/ffmpeg": {"platform/audio", "platform/packets"},
 }
+# Of the command, the one source that knows the parser of its command line.
+PARSER, PARSER_USER = "<CLI/", "tool/shared/arguments/Verb.cpp"
 SYSTEM_HEADER = re.compile(r"<(sys/|linux/|unistd|fcntl|libxml/|uriparser/|zlib|sha2|iconv|pwd|dirent|errno\.h)")
 INCLUDE = re.compile(r'^\s*#\s*include\s+(?:"([^"]+)"|(<[^>]+>))', re.MULTILINE)
 
@@ -80,7 +82,9 @@ def tool_folder(path):
 def tool_problems(source, top, public):
     """A verb of the command knows the public headers, its own folder and tool/shared; tool/shared knows no verb."""
     relative = source.relative_to(top).as_posix()
-    for ours, _ in INCLUDE.findall(source.read_text(encoding="utf-8")):
+    for ours, system in INCLUDE.findall(source.read_text(encoding="utf-8")):
+        if system.startswith(PARSER) and relative != PARSER_USER:
+            yield f"{relative}: {system} belongs to {PARSER_USER}"
         if ours.startswith("tool/") and relative.startswith("tool/"):
             if tool_folder(ours) not in (tool_folder(relative), "shared"):
                 yield f"{relative}: {ours} belongs to another verb"

@@ -234,12 +234,12 @@ private:
 void declareAdm(CommandLine& commandLine)
 {
     static AdmArguments arguments;
-    CLI::App& verb = commandLine.addVerb("adm", "Show what the ADM documents of audio files, or in XML files, describe",
-                                         [&commandLine] { return AdmCommand(arguments, commandLine.output()).run(); });
-    CommandLine::addFiles(verb, arguments.files)->required()->description("Audio files and XML files");
-    verb.add_flag("--long", arguments.isLong, "Show every block, with its ID");
-    verb.add_flag("--lenient", arguments.isLenient, "Let pass what can be passed over, and list it");
-    verb.add_flag("--check", arguments.isCheck, "Print only what is wrong: FILE:LINE:COLUMN: NAME: REASON");
+    Verb& verb = commandLine.addVerb("adm", "Show what the ADM documents of audio files, or in XML files, describe",
+                                     [&commandLine] { return AdmCommand(arguments, commandLine.output()).run(); });
+    CommandLine::addFiles(verb, arguments.files).required().describe("Audio files and XML files");
+    verb.addFlag("--long", arguments.isLong, "Show every block, with its ID");
+    verb.addFlag("--lenient", arguments.isLenient, "Let pass what can be passed over, and list it");
+    verb.addFlag("--check", arguments.isCheck, "Print only what is wrong: FILE:LINE:COLUMN: NAME: REASON");
 }
 
 const VerbRegistration registration{60, declareAdm};

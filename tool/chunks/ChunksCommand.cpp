@@ -146,10 +146,10 @@ bool runList(const std::vector<std::string>& files, const OutputOptions& options
 void declareChunks(CommandLine& commandLine)
 {
     static std::vector<std::string> files;
-    CLI::App& verb =
+    Verb& verb =
         commandLine.addVerb("chunks", "List the chunks of audio files; get, add or remove one", [&commandLine] {
             if (files.empty())
-                throw CLI::RequiredError("FILE");
+                throw MissingArgument("FILE");
             return runList(files, commandLine.output());
         });
     CommandLine::addFiles(verb, files);

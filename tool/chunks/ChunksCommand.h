@@ -2,10 +2,8 @@
 #pragma once
 
 class CommandLine;
-namespace CLI {
-class App;
-}
+class Verb;
 
-void declareChunksGet(CommandLine& commandLine, CLI::App& chunks);
+void declareChunksGet(CommandLine& commandLine, Verb& chunks);
 /// "add" and "remove".
-void declareChunkEdits(CommandLine& commandLine, CLI::App& chunks);
+void declareChunkEdits(CommandLine& commandLine, Verb& chunks);

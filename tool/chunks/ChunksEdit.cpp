@@ -28,7 +28,7 @@ Bytes readAll(const std::string& from)
 {
     const bool standardInput = from.empty() || from == "-";
     if (from.empty() && isTerminal(STDIN_FILENO))
-        throw CLI::ValidationError("name the chunk's content with --from IN, or type it after --from -");
+        throw UsageError("name the chunk's content with --from IN, or type it after --from -");
     const Descriptor opened(standardInput ? -1 : ::open(from.c_str(), O_RDONLY | O_NOCTTY | O_CLOEXEC));
     const int descriptor = standardInput ? STDIN_FILENO : opened.get();
     const std::string name = standardInput ? "standard input" : from;
@@ -198,21 +198,20 @@ void removeChunks(const EditArguments& arguments, const OutputOptions& output)
     print(arguments, output, arguments.sidecar.empty() ? removeFromContainer(arguments) : removeEverywhere(arguments));
 }
 
-CLI::App& declareEdit(CommandLine& commandLine, CLI::App& chunks, const std::string& name,
-                      const std::string& description, EditArguments& arguments,
-                      void (*edit)(const EditArguments&, const OutputOptions&))
+Verb& declareEdit(CommandLine& commandLine, Verb& chunks, const std::string& name, const std::string& description,
+                  EditArguments& arguments, void (*edit)(const EditArguments&, const OutputOptions&))
 {
-    CLI::App& verb = commandLine.addVerb(
+    Verb& verb = commandLine.addVerb(
         name, description,
         [&commandLine, &arguments, edit] {
             arguments.options.quiet = commandLine.output().quiet;
             return reportingFailures(arguments.file, [&] { edit(arguments, commandLine.output()); });
         },
         &chunks);
-    CommandLine::addFile(verb, arguments.file)->required();
-    CommandLine::addChunkId(verb, arguments.id)->required();
-    verb.add_flag("--force", arguments.force,
-                  "Do it even where sound or other data would be lost, or a sidecar is a recording");
+    CommandLine::addFile(verb, arguments.file).required();
+    CommandLine::addChunkId(verb, arguments.id).required();
+    verb.addFlag("--force", arguments.force,
+                 "Do it even where sound or other data would be lost, or a sidecar is a recording");
     addSidecarOption(verb, arguments.sidecar);
     CommandLine::addEditOptions(verb, arguments.options);
     return verb;
@@ -220,12 +219,11 @@ CLI::App& declareEdit(CommandLine& commandLine, CLI::App& chunks, const std::str
 
 } // namespace
 
-void declareChunkEdits(CommandLine& commandLine, CLI::App& chunks)
+void declareChunkEdits(CommandLine& commandLine, Verb& chunks)
 {
     static EditArguments toAdd, toRemove;
-    CLI::App& add = declareEdit(commandLine, chunks, "add", "Put a chunk behind the last one", toAdd, addChunk);
-    CommandLine::addPath(add, "--from", toAdd.from, "The file that holds its body; else standard input")
-        ->option_text("IN");
-    add.add_flag("--replace", toAdd.replace, "Remove the chunks that have the id already");
+    Verb& add = declareEdit(commandLine, chunks, "add", "Put a chunk behind the last one", toAdd, addChunk);
+    CommandLine::addPath(add, "--from", toAdd.from, "The file that holds its body; else standard input").label("IN");
+    add.addFlag("--replace", toAdd.replace, "Remove the chunks that have the id already");
     declareEdit(commandLine, chunks, "remove", "Remove every chunk of an id", toRemove, removeChunks);
 }

@@ -110,20 +110,20 @@ void getChunk(const GetArguments& arguments, const OutputOptions& options)
 
 } // namespace
 
-void declareChunksGet(CommandLine& commandLine, CLI::App& chunks)
+void declareChunksGet(CommandLine& commandLine, Verb& chunks)
 {
     static GetArguments arguments;
-    CLI::App& verb = commandLine.addVerb(
+    Verb& verb = commandLine.addVerb(
         "get", "Write a chunk's body to standard output or a file; of several chunks of the id, the last",
         [&commandLine] {
             if (commandLine.output().json && (arguments.out.empty() || arguments.out == "-"))
-                throw CLI::ValidationError("--json needs -o OUT, since the chunk itself goes to standard output");
+                throw UsageError("--json needs -o OUT, since the chunk itself goes to standard output");
             return reportingFailures(arguments.file, [&] { getChunk(arguments, commandLine.output()); });
         },
         &chunks);
-    CommandLine::addFile(verb, arguments.file)->required();
-    CommandLine::addChunkId(verb, arguments.id)->required();
-    CommandLine::addPath(verb, "-o,--output", arguments.out, "The file to write")->option_text("OUT");
+    CommandLine::addFile(verb, arguments.file).required();
+    CommandLine::addChunkId(verb, arguments.id).required();
+    CommandLine::addPath(verb, "-o,--output", arguments.out, "The file to write").label("OUT");
     CommandLine::addForceOption(verb, arguments.existing);
     addSidecarOption(verb, arguments.sidecar);
 }

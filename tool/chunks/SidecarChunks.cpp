@@ -122,15 +122,13 @@ void makeMetadata(const std::string& path, FourCC id, const Bytes& body)
 
 } // namespace
 
-void addSidecarOption(CLI::App& verb, std::string& extension)
+void addSidecarOption(Verb& verb, std::string& extension)
 {
-    verb.add_option("--sidecar", extension, "Any kind of file: chunks of what is no container lie beside it")
-        ->option_text("EXT")
-        ->check(CLI::Validator(
-            [](std::string& text) {
-                return text.empty() || text.find('/') != text.npos ? "\"" + text + "\" is no extension" : std::string();
-            },
-            ""));
+    const auto problem = [](const std::string& text) {
+        return text.empty() || text.find('/') != text.npos ? "\"" + text + "\" is no extension" : std::string();
+    };
+    verb.addText("--sidecar", extension, "Any kind of file: chunks of what is no container lie beside it", problem)
+        .label("EXT");
 }
 
 bool keepsItsChunks(const std::string& path)

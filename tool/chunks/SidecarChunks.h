@@ -10,11 +10,9 @@
 #include <optional>
 #include <string>
 
-namespace CLI {
-class App;
-}
+class Verb;
 
-void addSidecarOption(CLI::App& verb, std::string& extension);
+void addSidecarOption(Verb& verb, std::string& extension);
 
 struct SidecarChunk {
     Bytes body;

@@ -41,8 +41,8 @@ const DecodeFormat& formatFor(const DecodeArguments& arguments)
     const bool namesFile = arguments.out != "-" && !isDecodeFolder(arguments.out);
     const DecodeFormat* const format = namesFile ? decodeFormatOf(arguments.out) : decodeFormats().data();
     if (format == nullptr)
-        throw CLI::ValidationError("the extension of \"" + printable(arguments.out) +
-                                   "\" is that of no format here: --format says which is meant");
+        throw UsageError("the extension of \"" + printable(arguments.out) +
+                         "\" is that of no format here: --format says which is meant");
     return *format;
 }
 
@@ -54,9 +54,9 @@ bool runDecode(DecodeArguments& arguments, OutputOptions output)
     const std::vector<DecodeJob> jobs = decodeJobs(arguments.files, arguments.out, *arguments.options.wishes.format);
     const bool toOutput = arguments.out == "-";
     if (toOutput && output.json)
-        throw CLI::ValidationError("--json and the sound cannot both go to standard output");
+        throw UsageError("--json and the sound cannot both go to standard output");
     if (toOutput && isTerminal(STDOUT_FILENO))
-        throw CLI::ValidationError("sound does not go to a terminal: name a file");
+        throw UsageError("sound does not go to a terminal: name a file");
     std::optional<DecodeFolder> folder;
     if (!reportingFailures(arguments.out, [&] { folder.emplace(arguments.out); }))
         return false;
@@ -67,32 +67,26 @@ bool runDecode(DecodeArguments& arguments, OutputOptions output)
 }
 
 template <class Value>
-void addNumber(CLI::App& verb, const std::string& name, std::optional<Value>& value, std::pair<int, int> range,
+void addNumber(Verb& verb, const std::string& name, std::optional<Value>& value, std::pair<int, int> range,
                const std::string& description)
 {
-    verb.add_option_function<int>(
-            name, [&value](int number) { value = static_cast<Value>(number); },
-            fmt::format("{}, {} to {}", description, range.first, range.second))
-        ->option_text("N")
-        ->check(CLI::Range(range.first, range.second).description(""));
+    verb.addNumber(name, value, range, fmt::format("{}, {} to {}", description, range.first, range.second));
 }
 
 // An option whose text means something, or is a mistake.
 template <class Parse, class Take>
-void addText(CLI::App& verb, const std::string& name, const std::string& label, Parse parse, Take take,
+void addText(Verb& verb, const std::string& name, const std::string& label, Parse parse, Take take,
              const std::string& problem, const std::string& description)
 {
-    verb.add_option_function<std::string>(
-            name, [parse, take](const std::string& text) { take(parse(text)); }, description)
-        ->option_text(label)
-        ->check(CLI::Validator(
-            [parse, problem](std::string& text) {
+    verb.addText(
+            name, [parse, take](const std::string& text) { take(parse(text)); }, description,
+            [parse, problem](const std::string& text) {
                 return parse(text) ? "" : "\"" + printable(text) + "\" is " + problem;
-            },
-            ""));
+            })
+        .label(label);
 }
 
-void addSoundOptions(CLI::App& verb, DecodeWishes& wishes)
+void addSoundOptions(Verb& verb, DecodeWishes& wishes)
 {
     addText(
         verb, "--format", "FORMAT", decodeFormatNamed,
@@ -112,16 +106,16 @@ void addSoundOptions(CLI::App& verb, DecodeWishes& wishes)
 void declareDecode(CommandLine& commandLine)
 {
     static DecodeArguments arguments;
-    CLI::App& verb = commandLine.addVerb("decode", "Decode audio files of any format to linear PCM",
-                                         [&commandLine] { return runDecode(arguments, commandLine.output()); });
-    CommandLine::addFiles(verb, arguments.files)->required();
+    Verb& verb = commandLine.addVerb("decode", "Decode audio files of any format to linear PCM",
+                                     [&commandLine] { return runDecode(arguments, commandLine.output()); });
+    CommandLine::addFiles(verb, arguments.files).required();
     CommandLine::addPath(verb, "-o,--output", arguments.out,
                          "The file or folder to write to, \"-\" for standard output; else the current folder")
-        ->option_text("OUT");
+        .label("OUT");
     addSoundOptions(verb, arguments.options.wishes);
-    verb.add_flag("--conceal", arguments.options.conceal,
-                  "Keep what a damaged file gives, with silence for the frames that cannot be decoded");
-    verb.add_flag("--force", arguments.options.force, "Replace files that exist");
+    verb.addFlag("--conceal", arguments.options.conceal,
+                 "Keep what a damaged file gives, with silence for the frames that cannot be decoded");
+    verb.addFlag("--force", arguments.options.force, "Replace files that exist");
 }
 
 const VerbRegistration registration{90, declareDecode};

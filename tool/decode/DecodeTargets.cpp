@@ -1,10 +1,10 @@
 #include "tool/decode/DecodeTargets.h"
 
 #include "files/AudioFileNames.h"
+#include "tool/shared/arguments/UsageError.h"
 #include "tool/shared/output/Failure.h"
 #include "tool/shared/output/Terminal.h"
 
-#include <CLI/CLI.hpp>
 #include <fmt/format.h>
 
 #include <cerrno>
@@ -31,9 +31,8 @@ void refuseSharedOutputs(const std::vector<DecodeJob>& jobs)
     std::map<std::string, const DecodeJob*> byOutput;
     for (const DecodeJob& job : jobs)
         if (const auto [other, isFirst] = byOutput.try_emplace(job.output, &job); !isFirst)
-            throw CLI::ValidationError(fmt::format("{} and {} would both be decoded to {}",
-                                                   printable(other->second->file), printable(job.file),
-                                                   printable(job.output)));
+            throw UsageError(fmt::format("{} and {} would both be decoded to {}", printable(other->second->file),
+                                         printable(job.file), printable(job.output)));
 }
 
 } // namespace
@@ -49,9 +48,9 @@ std::vector<DecodeJob> decodeJobs(const std::vector<std::string>& files, const s
 {
     const bool toFolder = out.empty() || isDecodeFolder(out);
     if (files.size() > 1 && !toFolder)
-        throw CLI::ValidationError(out == "-" ? "one file at a time goes to standard output"
-                                              : "of several files the output is a folder: \"" + printable(out) +
-                                                    "\" is none; one to be made ends with \"/\"");
+        throw UsageError(out == "-" ? "one file at a time goes to standard output"
+                                    : "of several files the output is a folder: \"" + printable(out) +
+                                          "\" is none; one to be made ends with \"/\"");
     std::vector<DecodeJob> jobs;
     for (const std::string& file : files)
         jobs.push_back({file, toFolder ? outputIn(out, file, format) : out});

@@ -8,7 +8,7 @@
 
 /// A job for each file. `out` is empty (the current folder), "-", a folder, or the file to write; a folder is one that
 /// is there or ends with "/", and its files are called as what they come from, with the extension of the format. Throws
-/// CLI::ValidationError for several files to one output.
+/// UsageError for several files to one output.
 std::vector<DecodeJob> decodeJobs(const std::vector<std::string>& files, const std::string& out,
                                   const DecodeFormat& format);
 

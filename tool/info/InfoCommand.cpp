@@ -223,10 +223,10 @@ void declareInfo(CommandLine& commandLine)
 {
     static std::vector<std::string> files;
     static bool isLong = false;
-    CLI::App& verb = commandLine.addVerb("info", "Say what audio files are: length, rate, format, channels",
-                                         [&commandLine] { return runInfo(files, isLong, commandLine.output()); });
-    CommandLine::addFiles(verb, files)->required();
-    verb.add_flag("-l,--long", isLong, "Also the type by the name, the date of modification and the stereo partner");
+    Verb& verb = commandLine.addVerb("info", "Say what audio files are: length, rate, format, channels",
+                                     [&commandLine] { return runInfo(files, isLong, commandLine.output()); });
+    CommandLine::addFiles(verb, files).required();
+    verb.addFlag("-l,--long", isLong, "Also the type by the name, the date of modification and the stereo partner");
 }
 
 const VerbRegistration registration{10, declareInfo};

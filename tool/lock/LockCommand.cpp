@@ -189,7 +189,7 @@ int lockAndRun(const LockArguments& arguments, const OutputOptions& options)
 bool runLock(LockArguments& arguments, CommandLine& commandLine)
 {
     if (arguments.read + arguments.write + arguments.presenter > 1)
-        throw CLI::ValidationError("--read, --write and --presenter exclude each other");
+        throw UsageError("--read, --write and --presenter exclude each other");
     int status = kExitFailed;
     reportingFailures(arguments.file, [&] { status = lockAndRun(arguments, commandLine.output()); });
     commandLine.setFailureStatus(status);
@@ -199,17 +199,18 @@ bool runLock(LockArguments& arguments, CommandLine& commandLine)
 void declareLock(CommandLine& commandLine)
 {
     static LockArguments arguments;
-    CLI::App& verb =
+    Verb& verb =
         commandLine.addVerb("lock", "Hold others back from a file while a command runs, or until the end of input",
                             [&commandLine] { return runLock(arguments, commandLine); });
-    CommandLine::addFile(verb, arguments.file)->required()->description("The file, which need not exist");
-    CommandLine::addWords(verb, "COMMAND", arguments.command, "The command and its arguments, after --");
-    verb.add_flag("--read", arguments.read, "Let others read, and hold writers back");
-    verb.add_flag("--write", arguments.write, "Hold readers and writers back; so it is without an option");
-    verb.add_flag("--presenter", arguments.presenter, "The same as a program that keeps the file open, and is asked");
+    CommandLine::addFile(verb, arguments.file).required().describe("The file, which need not exist");
+    verb.addWords("COMMAND", arguments.command, "The command and its arguments, after --");
+    verb.addFlag("--read", arguments.read, "Let others read, and hold writers back");
+    verb.addFlag("--write", arguments.write, "Hold readers and writers back; so it is without an option");
+    verb.addFlag("--presenter", arguments.presenter, "The same as a program that keeps the file open, and is asked");
     addTimeout(verb, arguments.timeout, "Give up after that long: exit status 1, nothing is run");
-    verb.footer("Exit status: the command's, 128 + N when signal N ended it, 127 when there is no such command, 126\n"
-                "when it cannot be run; 1 when the lock was not had, and 2 for a mistake on the command line.");
+    verb.setFooter(
+        "Exit status: the command's, 128 + N when signal N ended it, 127 when there is no such command, 126\n"
+        "when it cannot be run; 1 when the lock was not had, and 2 for a mistake on the command line.");
 }
 
 const VerbRegistration registration{70, declareLock};

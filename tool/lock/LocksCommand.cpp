@@ -124,9 +124,9 @@ bool runLocks(const std::vector<std::string>& files, const OutputOptions& option
 void declareLocks(CommandLine& commandLine)
 {
     static std::vector<std::string> files;
-    CLI::App& verb = commandLine.addVerb("locks", "List who presents, holds and waits for files, by process",
-                                         [&commandLine] { return runLocks(files, commandLine.output()); });
-    CommandLine::addFiles(verb, files)->description("The files; else all");
+    Verb& verb = commandLine.addVerb("locks", "List who presents, holds and waits for files, by process",
+                                     [&commandLine] { return runLocks(files, commandLine.output()); });
+    CommandLine::addFiles(verb, files).describe("The files; else all");
 }
 
 const VerbRegistration registration{80, declareLocks};

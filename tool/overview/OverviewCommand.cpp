@@ -103,33 +103,33 @@ void workOn(const std::string& path, const OverviewArguments& arguments, Overvie
 }
 
 // What the parser cannot see: options that make sense only together, or not together.
-void requireSense(const OverviewArguments& arguments, const CLI::App& verb, const OutputOptions& output)
+void requireSense(const OverviewArguments& arguments, const Verb& verb, const OutputOptions& output)
 {
-    const auto given = [&verb](const char* option) { return verb.count(option) > 0; };
+    const auto given = [&verb](const char* option) { return verb.isGiven(option); };
     if (arguments.draws() && arguments.files.size() > 1)
-        throw CLI::ValidationError("--png and --svg draw one file at a time");
+        throw UsageError("--png and --svg draw one file at a time");
     if (!arguments.draws())
         for (const char* const option :
              {"--width", "--height", "--start", "--end", "--frames", "--colors", "--scale", "--force"})
             if (given(option))
-                throw CLI::ValidationError(std::string(option) + " is about a picture: --png or --svg says where to");
+                throw UsageError(std::string(option) + " is about a picture: --png or --svg says where to");
     if (!arguments.store)
         for (const char* const option : {"--in-place", "--dry-run", "--backup", "--keep-times", "--timeout"})
             if (given(option))
-                throw CLI::ValidationError(std::string(option) + " is about --store");
+                throw UsageError(std::string(option) + " is about --store");
     if (arguments.store && arguments.fromStored)
-        throw CLI::ValidationError("--store computes the overview, --stored does not");
+        throw UsageError("--store computes the overview, --stored does not");
     requireOrder(arguments.start, arguments.end);
     if (arguments.draws() && arguments.png == arguments.svg)
-        throw CLI::ValidationError("--png and --svg name the same file");
+        throw UsageError("--png and --svg name the same file");
     const bool toOutput = arguments.png == "-" || arguments.svg == "-";
     if (toOutput && output.json)
-        throw CLI::ValidationError("--json and a picture cannot both go to standard output");
+        throw UsageError("--json and a picture cannot both go to standard output");
     if (arguments.png == "-" && isTerminal(STDOUT_FILENO))
-        throw CLI::ValidationError("a PNG does not go to a terminal: name a file");
+        throw UsageError("a PNG does not go to a terminal: name a file");
 }
 
-bool runOverview(OverviewArguments& arguments, const CLI::App& verb, OutputOptions output)
+bool runOverview(OverviewArguments& arguments, const Verb& verb, OutputOptions output)
 {
     requireSense(arguments, verb, output);
     arguments.edit.quiet = output.quiet;
@@ -152,51 +152,46 @@ bool runOverview(OverviewArguments& arguments, const CLI::App& verb, OutputOptio
     return good;
 }
 
-void addSize(CLI::App& verb, const std::string& name, int& pixels, std::pair<int, int> range)
+void addSize(Verb& verb, const std::string& name, int& pixels, std::pair<int, int> range)
 {
-    verb.add_option(name, pixels,
-                    fmt::format("Its size in pixels, {} to {}; else {}", range.first, range.second, pixels))
-        ->option_text("N")
-        ->check(CLI::Range(range.first, range.second).description(""));
+    verb.addNumber(name, pixels, range,
+                   fmt::format("Its size in pixels, {} to {}; else {}", range.first, range.second, pixels));
 }
 
-void addPictureOptions(CLI::App& verb, OverviewArguments& arguments)
+void addPictureOptions(Verb& verb, OverviewArguments& arguments)
 {
-    CommandLine::addPath(verb, "--png", arguments.png, "Draw a PNG; \"-\" is standard output")->option_text("OUT");
-    CommandLine::addPath(verb, "--svg", arguments.svg, "Draw an SVG; \"-\" is standard output")->option_text("OUT");
+    CommandLine::addPath(verb, "--png", arguments.png, "Draw a PNG; \"-\" is standard output").label("OUT");
+    CommandLine::addPath(verb, "--svg", arguments.svg, "Draw an SVG; \"-\" is standard output").label("OUT");
     CommandLine::addForceOption(verb, arguments.existing);
     addSize(verb, "--width", arguments.picture.width, kWidths);
     addSize(verb, "--height", arguments.picture.height, kHeights);
     addSoundRange(verb, {.start = [&arguments](const SoundLength& start) { arguments.start = start; },
                          .end = [&arguments](const SoundLength& end) { arguments.end = end; },
                          .frames = [&arguments](const SoundLength& frames) { arguments.frames = frames; }});
-    verb.add_flag("--scale", arguments.picture.scale, "Show a scale of the amplitude, in decibels");
-    verb.add_option_function<std::string>(
-            "--colors",
-            [&arguments](const std::string& text) {
-                arguments.colors = colorsFromText(text).value_or(arguments.colors);
-            },
-            "WAVE,BACKGROUND[,AXIS] as RRGGBB, the background also none; or one of: " + themeNames())
-        ->option_text("COLORS")
-        ->check(CLI::Validator(
-            [](std::string& text) {
-                return colorsFromText(text) ? ""
-                                            : "\"" + printable(text) + "\" is neither WAVE,BACKGROUND[,AXIS], as in " +
-                                                  "1f6feb,ffffff, nor one of " + themeNames();
-            },
-            ""));
+    verb.addFlag("--scale", arguments.picture.scale, "Show a scale of the amplitude, in decibels");
+    const auto takeColors = [&arguments](const std::string& text) {
+        arguments.colors = colorsFromText(text).value_or(arguments.colors);
+    };
+    const auto problem = [](const std::string& text) {
+        return colorsFromText(text) ? ""
+                                    : "\"" + printable(text) + "\" is neither WAVE,BACKGROUND[,AXIS], as in " +
+                                          "1f6feb,ffffff, nor one of " + themeNames();
+    };
+    verb.addText("--colors", takeColors,
+                 "WAVE,BACKGROUND[,AXIS] as RRGGBB, the background also none; or one of: " + themeNames(), problem)
+        .label("COLORS");
 }
 
 void declareOverview(CommandLine& commandLine)
 {
     static OverviewArguments arguments;
-    static CLI::App* verb = nullptr;
+    static Verb* verb = nullptr;
     verb = &commandLine.addVerb("overview", "Show waveforms: in the terminal, as numbers, as a PNG or SVG; store them",
                                 [&commandLine] { return runOverview(arguments, *verb, commandLine.output()); });
-    CommandLine::addFiles(*verb, arguments.files)->required();
+    CommandLine::addFiles(*verb, arguments.files).required();
     addPictureOptions(*verb, arguments);
-    verb->add_flag("--stored", arguments.fromStored, "Take the overview that is stored in the file, not the sound");
-    verb->add_flag("--store", arguments.store, "Store the overview in the file");
+    verb->addFlag("--stored", arguments.fromStored, "Take the overview that is stored in the file, not the sound");
+    verb->addFlag("--store", arguments.store, "Store the overview in the file");
     CommandLine::addEditOptions(*verb, arguments.edit);
 }
 

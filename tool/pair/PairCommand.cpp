@@ -83,9 +83,9 @@ bool runPair(const std::vector<std::string>& files, const OutputOptions& options
 void declarePair(CommandLine& commandLine)
 {
     static std::vector<std::string> files;
-    CLI::App& verb = commandLine.addVerb("pair", "List stereo pairs of mono files, and halves without their partner",
-                                         [&commandLine] { return runPair(files, commandLine.output()); });
-    CommandLine::addFiles(verb, files)->required()->description("The files, and folders of them");
+    Verb& verb = commandLine.addVerb("pair", "List stereo pairs of mono files, and halves without their partner",
+                                     [&commandLine] { return runPair(files, commandLine.output()); });
+    CommandLine::addFiles(verb, files).required().describe("The files, and folders of them");
 }
 
 const VerbRegistration registration{15, declarePair};

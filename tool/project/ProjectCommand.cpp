@@ -12,7 +12,6 @@
 #include "tool/shared/output/Failure.h"
 #include "tool/shared/output/JsonRecords.h"
 
-#include <cstdlib>
 #include <limits>
 
 namespace {
@@ -23,7 +22,7 @@ constexpr int kMostBackups = 100; // that two digits name
 bool runOn(const std::string& path, const OutputOptions& output, const std::function<void()>& work)
 {
     if (path.empty())
-        throw CLI::RequiredError("PACKAGE");
+        throw MissingArgument("PACKAGE");
     platform::setApplicationInfo({"ktfiles", KTFILES_VERSION});
     return reportingFailures(path, [&] {
         try {
@@ -96,27 +95,22 @@ void renameAlternative(const ProjectArguments& arguments, const OutputOptions& o
     });
 }
 
-void addPackage(CLI::App& verb, ProjectArguments& arguments)
+void addPackage(Verb& verb, ProjectArguments& arguments)
 {
-    CommandLine::addFile(verb, arguments.package, "PACKAGE")->description("The project package");
+    CommandLine::addFile(verb, arguments.package, "PACKAGE").describe("The project package");
 }
 
-CLI::Validator indexRange()
+constexpr std::pair<long, long> kIndexes{0, std::numeric_limits<std::uint32_t>::max()};
+
+void addAlternative(Verb& verb, ProjectArguments& arguments)
 {
-    return CLI::Range(0L, long{std::numeric_limits<std::uint32_t>::max()}).description("");
+    verb.addNumber("--alternative", arguments.alternative, kIndexes, "The alternative's number, else the active one");
 }
 
-void addAlternative(CLI::App& verb, ProjectArguments& arguments)
-{
-    verb.add_option("--alternative", arguments.alternative, "The alternative's number, else the active one")
-        ->option_text("N")
-        ->check(indexRange());
-}
-
-void declareReading(CommandLine& commandLine, CLI::App& project, ProjectArguments& arguments)
+void declareReading(CommandLine& commandLine, Verb& project, ProjectArguments& arguments)
 {
     const OutputOptions& output = commandLine.output();
-    CLI::App& media = commandLine.addVerb(
+    Verb& media = commandLine.addVerb(
         "media", "List the media files that a project uses",
         [&] {
             return runOn(arguments.package, output, [&] {
@@ -126,12 +120,10 @@ void declareReading(CommandLine& commandLine, CLI::App& project, ProjectArgument
         },
         &project);
     addPackage(media, arguments);
-    media.add_flag("--missing", arguments.missing, "Only those that are not there");
-    media.add_option("--alternative", arguments.alternative, "Only those of one alternative")
-        ->option_text("N")
-        ->check(indexRange());
+    media.addFlag("--missing", arguments.missing, "Only those that are not there");
+    media.addNumber("--alternative", arguments.alternative, kIndexes, "Only those of one alternative");
 
-    CLI::App& dirs = commandLine.addVerb(
+    Verb& dirs = commandLine.addVerb(
         "dirs", "List a project's media and working folders, or create them",
         [&] {
             return runOn(arguments.package, output, [&] {
@@ -147,70 +139,62 @@ void declareReading(CommandLine& commandLine, CLI::App& project, ProjectArgument
         },
         &project);
     addPackage(dirs, arguments);
-    dirs.add_flag("--create", arguments.create, "Create those that are missing");
+    dirs.addFlag("--create", arguments.create, "Create those that are missing");
     addAlternative(dirs, arguments);
     addTimeout(dirs, arguments.wait.timeoutSeconds);
 }
 
-void declareEdits(CommandLine& commandLine, CLI::App& project, ProjectArguments& arguments)
+void declareEdits(CommandLine& commandLine, Verb& project, ProjectArguments& arguments)
 {
     const OutputOptions& output = commandLine.output();
     const auto edit = [&](const char* name, const char* description,
-                          void (*work)(const ProjectArguments&, const OutputOptions&)) -> CLI::App& {
-        CLI::App& verb = commandLine.addVerb(
+                          void (*work)(const ProjectArguments&, const OutputOptions&)) -> Verb& {
+        Verb& verb = commandLine.addVerb(
             name, description,
             [&, work] {
                 arguments.edit.quiet = arguments.wait.quiet = output.quiet;
+                if (arguments.edit.timeout) // an option of edits of a file: for the package too
+                    arguments.wait.timeoutSeconds = arguments.edit.timeout;
                 return runOn(arguments.package, output, [&] { work(arguments, output); });
             },
             &project);
         addPackage(verb, arguments);
         return verb;
     };
-    CLI::App& backup = edit("backup", "Back up an alternative's project data", backUp);
+    Verb& backup = edit("backup", "Back up an alternative's project data", backUp);
     addAlternative(backup, arguments);
-    backup.add_option("--keep", arguments.keep, "Delete the oldest backups, so that there are N with the new one")
-        ->option_text("N")
-        ->check(CLI::Range(1, kMostBackups).description(""));
-    backup.add_flag("--dry-run", arguments.edit.dryRun, "Say what would be done, and do nothing");
+    backup.addNumber("--keep", arguments.keep, {1, kMostBackups},
+                     "Delete the oldest backups, so that there are N with the new one");
+    backup.addFlag("--dry-run", arguments.edit.dryRun, "Say what would be done, and do nothing");
 
-    CLI::App& back = edit("restore", "Exchange an alternative's project data with a backup's", restoreBackup);
-    back.add_option("BACKUP", arguments.backup, "The backup's name, such as 03")->option_text(" ")->required();
+    Verb& back = edit("restore", "Exchange an alternative's project data with a backup's", restoreBackup);
+    back.addText("BACKUP", arguments.backup, "The backup's name, such as 03").label(" ").required();
     addAlternative(back, arguments);
-    back.add_flag("--dry-run", arguments.edit.dryRun, "Say what would be done, and do nothing");
+    back.addFlag("--dry-run", arguments.edit.dryRun, "Say what would be done, and do nothing");
 
-    CLI::App& settle =
-        edit("settle", "Complete an exchange with a backup that was cut short, or undo it", settleExchange);
-    CLI::Option* undo = settle.add_flag("--undo", arguments.undo, "Put everything back to where it was");
-    settle.add_flag("--forget", arguments.forget, "Leave everything where it is, and drop the record of the exchange")
-        ->excludes(undo);
+    Verb& settle = edit("settle", "Complete an exchange with a backup that was cut short, or undo it", settleExchange);
+    const Argument undo = settle.addFlag("--undo", arguments.undo, "Put everything back to where it was");
+    settle.addFlag("--forget", arguments.forget, "Leave everything where it is, and drop the record of the exchange")
+        .excludes(undo);
     CommandLine::addPath(settle, "--with", arguments.backup,
                          "The backup's folder, where the record names one elsewhere")
-        ->option_text("FOLDER");
+        .label("FOLDER");
     addAlternative(settle, arguments);
-    settle.add_flag("--dry-run", arguments.edit.dryRun, "Say what would be done, and do nothing");
+    settle.addFlag("--dry-run", arguments.edit.dryRun, "Say what would be done, and do nothing");
 
-    CLI::App& rename = edit("rename-alternative", "Give an alternative another name", renameAlternative);
-    rename.add_option("N", arguments.index, "The alternative's number")
-        ->option_text(" ")
-        ->required()
-        ->check(indexRange());
-    rename.add_option("NAME", arguments.name, "Its new name")->option_text(" ")->required();
+    Verb& rename = edit("rename-alternative", "Give an alternative another name", renameAlternative);
+    rename.addNumber("N", arguments.index, kIndexes, "The alternative's number").label(" ").required();
+    rename.addText("NAME", arguments.name, "Its new name").label(" ").required();
     CommandLine::addEditOptions(rename, arguments.edit);
 
-    for (CLI::App* verb : {&backup, &back, &settle, &rename})
-        if (CLI::Option* timeout = verb->get_option_no_throw("--timeout")) // of the edit options: for the package too
-            timeout->each([&arguments](const std::string& text) {
-                arguments.wait.timeoutSeconds = std::strtod(text.c_str(), nullptr);
-            });
-        else
-            addTimeout(*verb, arguments.wait.timeoutSeconds);
+    for (Verb* const verb : {&backup, &back, &settle})
+        addTimeout(*verb, arguments.wait.timeoutSeconds);
 }
 
 void declareProject(CommandLine& commandLine)
 {
     static ProjectArguments arguments;
-    CLI::App& verb = commandLine.addVerb("project", "Show what a project package holds; back up and restore it", [&] {
+    Verb& verb = commandLine.addVerb("project", "Show what a project package holds; back up and restore it", [&] {
         return runOn(arguments.package, commandLine.output(),
                      [&] { printProject(arguments.package, *openProject(arguments.package), commandLine.output()); });
     });

@@ -66,7 +66,7 @@ public:
             lock.lock();
             entry.result = std::move(result);
         }
-        std::optional<Result> result = std::move(entries_.front().result);
+        std::optional<Result> result = std::move(*entries_.front().result);
         entries_.pop_front();
         --started_;
         room_.notify_one();

@@ -123,7 +123,7 @@ void scanByThreads(const ScanArguments& arguments, const std::function<Records(c
 bool runScan(const ScanArguments& arguments, const OutputOptions& options)
 {
     if (arguments.csv && options.json)
-        throw CLI::ValidationError("--csv and --json exclude each other");
+        throw UsageError("--csv and --json exclude each other");
     const ScanForm form = arguments.csv ? ScanForm::csv : scanForm(outputForm(options));
     ScanWriter writer(form, usesColor(options.color));
     ScanProgress progress(options.quiet);
@@ -153,13 +153,12 @@ bool runScan(const ScanArguments& arguments, const OutputOptions& options)
 void declareScan(CommandLine& commandLine)
 {
     static ScanArguments arguments;
-    CLI::App& verb = commandLine.addVerb("scan", "List the loops below folders, with their tags",
-                                         [&commandLine] { return runScan(arguments, commandLine.output()); });
-    CommandLine::addFiles(verb, arguments.folders, "FOLDER")->required()->description("The folders");
-    verb.add_flag("--csv", arguments.csv, "Print comma-separated values (RFC 4180), with a header");
-    verb.add_option("-j,--threads", arguments.threads, "How many files are read at once; else one per core")
-        ->option_text("N")
-        ->check(CLI::Range(1U, kMostThreads).description(""));
+    Verb& verb = commandLine.addVerb("scan", "List the loops below folders, with their tags",
+                                     [&commandLine] { return runScan(arguments, commandLine.output()); });
+    CommandLine::addFiles(verb, arguments.folders, "FOLDER").required().describe("The folders");
+    verb.addFlag("--csv", arguments.csv, "Print comma-separated values (RFC 4180), with a header");
+    verb.addNumber("-j,--threads", arguments.threads, {1, kMostThreads},
+                   "How many files are read at once; else one per core");
 }
 
 const VerbRegistration registration{40, declareScan};

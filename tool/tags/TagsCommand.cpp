@@ -79,12 +79,12 @@ bool runTags(const std::vector<std::string>& files, const OutputOptions& options
 void declareTags(CommandLine& commandLine)
 {
     static std::vector<std::string> files;
-    CLI::App& verb = commandLine.addVerb("tags", "Show the loop tags of AIFF and CAF files; set, remove or copy some",
-                                         [&commandLine] {
-                                             if (files.empty())
-                                                 throw CLI::RequiredError("FILE");
-                                             return runTags(files, commandLine.output());
-                                         });
+    Verb& verb = commandLine.addVerb("tags", "Show the loop tags of AIFF and CAF files; set, remove or copy some",
+                                     [&commandLine] {
+                                         if (files.empty())
+                                             throw MissingArgument("FILE");
+                                         return runTags(files, commandLine.output());
+                                     });
     CommandLine::addFiles(verb, files);
     declareTagsSet(commandLine, verb);
     declareTagsRemove(commandLine, verb);

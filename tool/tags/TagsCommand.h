@@ -2,10 +2,8 @@
 #pragma once
 
 class CommandLine;
-namespace CLI {
-class App;
-}
+class Verb;
 
-void declareTagsSet(CommandLine& commandLine, CLI::App& tags);
-void declareTagsRemove(CommandLine& commandLine, CLI::App& tags);
-void declareTagsCopy(CommandLine& commandLine, CLI::App& tags);
+void declareTagsSet(CommandLine& commandLine, Verb& tags);
+void declareTagsRemove(CommandLine& commandLine, Verb& tags);
+void declareTagsCopy(CommandLine& commandLine, Verb& tags);

@@ -31,13 +31,13 @@ bool runCopy(const CopyArguments& arguments, const OutputOptions& output)
 
 } // namespace
 
-void declareTagsCopy(CommandLine& commandLine, CLI::App& tags)
+void declareTagsCopy(CommandLine& commandLine, Verb& tags)
 {
     static CopyArguments arguments;
-    CLI::App& verb = commandLine.addVerb(
+    Verb& verb = commandLine.addVerb(
         "copy", "Copy all that makes a loop to other files",
         [&commandLine] { return runCopy(arguments, commandLine.output()); }, &tags);
-    CommandLine::addFile(verb, arguments.from, "FROM")->required()->description("The file to copy from");
-    CommandLine::addFiles(verb, arguments.to, "TO")->required()->description("The files to copy to");
+    CommandLine::addFile(verb, arguments.from, "FROM").required().describe("The file to copy from");
+    CommandLine::addFiles(verb, arguments.to, "TO").required().describe("The files to copy to");
     CommandLine::addEditOptions(verb, arguments.options);
 }

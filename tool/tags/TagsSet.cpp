@@ -71,12 +71,11 @@ void refuseTransients(const std::string& path, const LoopTags& tags)
         return;
     const std::uint64_t last = tags.transients.back().frame();
     if (tags.frames > 0 && last > tags.frames)
-        throw CLI::ValidationError(fmt::format("{}: a transient at frame {}, but the file ends at frame {}",
-                                               printable(path), last, tags.frames));
+        throw UsageError(fmt::format("{}: a transient at frame {}, but the file ends at frame {}", printable(path),
+                                     last, tags.frames));
     if (tags.fileType == kAIFF && last > std::numeric_limits<std::uint32_t>::max())
-        throw CLI::ValidationError(
-            fmt::format("{}: a transient at frame {}, but an AIFF file counts no further than {}", printable(path),
-                        last, std::numeric_limits<std::uint32_t>::max()));
+        throw UsageError(fmt::format("{}: a transient at frame {}, but an AIFF file counts no further than {}",
+                                     printable(path), last, std::numeric_limits<std::uint32_t>::max()));
 }
 
 // Beats make a loop of a file that does not say what it is.
@@ -111,7 +110,7 @@ void refuseLosses(const std::string& path, const Dictionary& wanted, const Dicti
         const std::string text = fmt::format("{} cannot keep {}={} here: it would be read as {}",
                                              containerPhrase(fileType), field.name, inWords(want), inWords(have));
         if (assigned)
-            throw CLI::ValidationError(printable(path) + ": " + text);
+            throw UsageError(printable(path) + ": " + text);
         if (fileType != kCaff || field.key != std::string_view(VireoLoopCombinedTagsChunkDataFileTypeKey))
             throw Failure(text + "; set or remove it as well");
     }
@@ -121,8 +120,8 @@ void refuseLostTexts(const std::string& path, const LoopTags& after, const std::
 {
     for (const auto& [field, value] : assignments)
         if (field->isFileInfo && !isAbsent(value) && valueUnder(after.info, field->key) != value)
-            throw CLI::ValidationError(fmt::format("{}: {} cannot keep {} that long", printable(path),
-                                                   containerPhrase(after.fileType), field->name));
+            throw UsageError(fmt::format("{}: {} cannot keep {} that long", printable(path),
+                                         containerPhrase(after.fileType), field->name));
 }
 
 // What goes or is replaced though the library could not read it is told as well.
@@ -229,26 +228,26 @@ bool runRemove(const SetArguments& arguments, const OutputOptions& output)
     return editTags(parsed.files, editor, arguments.options, output);
 }
 
-void declareEdit(CommandLine& commandLine, CLI::App& tags, const std::string& name, const std::string& description,
+void declareEdit(CommandLine& commandLine, Verb& tags, const std::string& name, const std::string& description,
                  const std::string& words, SetArguments& arguments,
                  bool (*run)(const SetArguments&, const OutputOptions&))
 {
-    CLI::App& verb = commandLine.addVerb(
+    Verb& verb = commandLine.addVerb(
         name, description, [&commandLine, &arguments, run] { return run(arguments, commandLine.output()); }, &tags);
-    CommandLine::addFiles(verb, arguments.words)->required()->description(words);
+    CommandLine::addFiles(verb, arguments.words).required().describe(words);
     CommandLine::addEditOptions(verb, arguments.options);
 }
 
 } // namespace
 
-void declareTagsSet(CommandLine& commandLine, CLI::App& tags)
+void declareTagsSet(CommandLine& commandLine, Verb& tags)
 {
     static SetArguments toSet;
     declareEdit(commandLine, tags, "set", "Set tags; what is not named stays",
                 "The audio files, and KEY=VALUE for each tag, as in genre=Jazz, key=F#, signature=4/4", toSet, runSet);
 }
 
-void declareTagsRemove(CommandLine& commandLine, CLI::App& tags)
+void declareTagsRemove(CommandLine& commandLine, Verb& tags)
 {
     static SetArguments toRemove;
     declareEdit(commandLine, tags, "remove", "Remove tags, or without keys everything that makes a loop",

@@ -2,14 +2,12 @@
 #pragma once
 
 #include "platform/core/FourCC.h"
+#include "tool/shared/arguments/UsageError.h"
+#include "tool/shared/arguments/Verb.h"
 #include "tool/shared/edits/OutputFile.h"
 #include "tool/shared/edits/SafeEdit.h"
 #include "tool/shared/output/Output.h"
 
-#include <CLI/CLI.hpp>
-
-#include <functional>
-#include <map>
 #include <string>
 #include <vector>
 
@@ -22,24 +20,19 @@ public:
     CommandLine();
 
     /// A verb, or with `parent` an object of one. `run` does the work after parsing and tells whether all went well; it
-    /// may throw a CLI::ParseError for a combination of arguments that makes no sense.
-    CLI::App& addVerb(const std::string& name, const std::string& description, std::function<bool()> run,
-                      CLI::App* parent = nullptr);
+    /// may throw a UsageError for a combination of arguments that makes no sense.
+    Verb& addVerb(const std::string& name, const std::string& description, Verb::Work run, Verb* parent = nullptr);
     const OutputOptions& output() const { return output_; }
 
     // Arguments that verbs have in common. The values must outlive the parsing.
-    static CLI::Option* addFile(CLI::App& verb, std::string& file, const std::string& name = "FILE");
-    static CLI::Option* addFiles(CLI::App& verb, std::vector<std::string>& files, const std::string& name = "FILE");
-    /// Words that are another program's business; they come last.
-    static CLI::Option* addWords(CLI::App& verb, const std::string& name, std::vector<std::string>& words,
-                                 const std::string& description);
-    static CLI::Option* addChunkId(CLI::App& verb, FourCC& id);
+    static Argument addFile(Verb& verb, std::string& file, const std::string& name = "FILE");
+    static Argument addFiles(Verb& verb, std::vector<std::string>& files, const std::string& name = "FILE");
+    static Argument addChunkId(Verb& verb, FourCC& id);
     /// An option whose value names a file; "-" stands for standard input or output.
-    static CLI::Option* addPath(CLI::App& verb, const std::string& name, std::string& path,
-                                const std::string& description);
+    static Argument addPath(Verb& verb, const std::string& name, std::string& path, const std::string& description);
     /// "--force", of verbs that write files of the user's choice.
-    static void addForceOption(CLI::App& verb, OutputFile::Existing& existing);
-    static void addEditOptions(CLI::App& verb, EditOptions& options);
+    static void addForceOption(Verb& verb, OutputFile::Existing& existing);
+    static void addEditOptions(Verb& verb, EditOptions& options);
 
     /// The exit status when the verb's work tells that not all went well, in the place of kExitFailed.
     void setFailureStatus(int status) { failureStatus_ = status; }
@@ -48,15 +41,14 @@ public:
     int run(int argc, char** argv);
 
 private:
-    void addOutputOptions(CLI::App& verb);
+    void addOutputOptions(Verb& verb);
     void addHelpVerb();
     bool printHelp() const;
-    int parseAndRun(std::vector<std::string> arguments);
+    int parseAndRun(const std::vector<std::string>& arguments);
 
-    CLI::App app_;
+    Verb program_;
     OutputOptions output_;
     int failureStatus_ = kExitFailed;
-    std::map<const CLI::App*, std::function<bool()>> work_;
     std::vector<std::string> helpTopics_;
 };
 

@@ -19,17 +19,15 @@ void useCoordinationFolderOfEnvironment()
         platform::FileCoordinator::setCoordinationFolder(folder);
 }
 
-void addCoordinationFolder(CLI::App& verb)
+void addCoordinationFolder(Verb& verb)
 {
-    verb.add_option_function<std::string>(
-            "--coordination",
-            [](const std::string& folder) {
-                std::error_code error; // of a working folder that is gone: the access then says what is wrong
-                const std::string absolute = std::filesystem::absolute(folder, error).string();
-                ::setenv(kVariable, absolute.c_str(), 1);
-                platform::FileCoordinator::setCoordinationFolder(error ? folder : absolute);
-            },
-            "The folder in which programs coordinate, the same for all")
-        ->option_text("FOLDER")
-        ->check(CLI::Validator([](std::string& text) { return text.empty() ? "a file name is missing" : ""; }, ""));
+    const auto useFolder = [](const std::string& folder) {
+        std::error_code error; // of a working folder that is gone: the access then says what is wrong
+        const std::string absolute = std::filesystem::absolute(folder, error).string();
+        ::setenv(kVariable, absolute.c_str(), 1);
+        platform::FileCoordinator::setCoordinationFolder(error ? folder : absolute);
+    };
+    verb.addText("--coordination", useFolder, "The folder in which programs coordinate, the same for all",
+                 [](const std::string& text) { return text.empty() ? "a file name is missing" : ""; })
+        .label("FOLDER");
 }

@@ -5,9 +5,7 @@
 
 #include <functional>
 
-namespace CLI {
-class App;
-}
+class Verb;
 
 /// Where the values go.
 struct SoundRangeTakers {
@@ -15,6 +13,6 @@ struct SoundRangeTakers {
 };
 
 /// --start, and either --end or --frames.
-void addSoundRange(CLI::App& verb, const SoundRangeTakers& takers);
-/// Throws CLI::ValidationError when both are of one kind and the end is not behind the start.
+void addSoundRange(Verb& verb, const SoundRangeTakers& takers);
+/// Throws UsageError when both are of one kind and the end is not behind the start.
 void requireOrder(const SoundLength& start, const std::optional<SoundLength>& end);

@@ -10,21 +10,21 @@ namespace {
 
 constexpr double kLongestTimeout = 1e8; // three years
 
-std::string timeoutProblem(const std::string& text)
+std::optional<double> timeoutFromText(const std::string& text)
 {
     double seconds = 0;
     const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), seconds);
     const bool isNumber = error == std::errc() && end == text.data() + text.size() && std::isfinite(seconds);
-    return isNumber && seconds >= 0 && seconds <= kLongestTimeout
-               ? ""
-               : "\"" + printable(text) + "\" is no time in seconds, 0 to 100000000";
+    return isNumber && seconds >= 0 && seconds <= kLongestTimeout ? std::optional(seconds) : std::nullopt;
 }
 
 } // namespace
 
-void addTimeout(CLI::App& verb, std::optional<double>& seconds, const std::string& description)
+void addTimeout(Verb& verb, std::optional<double>& seconds, const std::string& description)
 {
-    verb.add_option("--timeout", seconds, description)
-        ->option_text("SECONDS")
-        ->check(CLI::Validator([](std::string& text) { return timeoutProblem(text); }, ""));
+    const auto problem = [](const std::string& text) {
+        return timeoutFromText(text) ? "" : "\"" + printable(text) + "\" is no time in seconds, 0 to 100000000";
+    };
+    const auto take = [&seconds](const std::string& text) { seconds = timeoutFromText(text); };
+    verb.addText("--timeout", take, description, problem).label("SECONDS");
 }

@@ -2,9 +2,9 @@
 
 #include "loops/VireoLoopChunks.h"
 #include "platform/String.h"
+#include "tool/shared/arguments/UsageError.h"
 #include "tool/shared/output/Terminal.h"
 
-#include <CLI/CLI.hpp>
 #include <fmt/format.h>
 
 #include <algorithm>
@@ -46,7 +46,7 @@ constexpr std::string_view kModeNames[] = {"none", "minor", "major", "neither", 
 
 [[noreturn]] void refuse(const std::string& message)
 {
-    throw CLI::ValidationError(message);
+    throw UsageError(message);
 }
 
 [[noreturn]] void refuseValue(std::string_view key, std::string_view value, const std::string& expected)
@@ -213,7 +213,7 @@ TagArguments parseAssignments(std::span<const std::string> arguments)
                    std::string_view(argument).substr(equals + 1));
     }
     if (parsed.files.empty())
-        throw CLI::RequiredError("FILE");
+        throw MissingArgument("FILE");
     if (parsed.assignments.empty())
         refuse("KEY=VALUE is missing; keys are " + knownKeys());
     return parsed;
@@ -234,7 +234,7 @@ TagArguments parseKeys(std::span<const std::string> arguments)
             parsed.assignments.push_back({field, {}});
     }
     if (parsed.files.empty())
-        throw CLI::RequiredError("FILE");
+        throw MissingArgument("FILE");
     return parsed;
 }
 

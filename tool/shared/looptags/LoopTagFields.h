@@ -36,7 +36,7 @@ struct TagAssignment {
 };
 
 /// Files and "KEY=VALUE" in any order, told apart: what has a "=" and no "/" ahead of it is an assignment. Throws
-/// CLI::ValidationError for an unknown key, a key named twice and a value that can never be.
+/// UsageError for an unknown key, a key named twice and a value that can never be.
 struct TagArguments {
     std::vector<std::string> files;
     std::vector<TagAssignment> assignments;

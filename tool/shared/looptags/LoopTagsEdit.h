@@ -44,7 +44,7 @@ struct TagsEditor {
     const char* action;
     const char* done;   // "set"
     const char* dryRun; // "would set"
-    /// Throws Failure for a file that cannot be edited so, CLI::ParseError for a mistake on the command line.
+    /// Throws Failure for a file that cannot be edited so, UsageError for a mistake on the command line.
     std::function<TagsPlan(const LoopTags& before, const std::string& target)> plan;
 };
 

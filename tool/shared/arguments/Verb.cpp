@@ -1,0 +1,208 @@
+#include "tool/shared/arguments/Verb.h"
+
+#include "tool/shared/arguments/UsageError.h"
+
+#include <CLI/CLI.hpp>
+
+#include <algorithm>
+#include <iterator>
+
+namespace {
+
+// The parser takes a value "[a,b]" apart as a list, but it is a fine file name: this hides the bracket from it.
+constexpr char kBracketGuard = '\x01';
+
+std::string guarded(const std::string& argument)
+{
+    const bool looksLikeList = argument.size() >= 2 && argument.front() == '[' && argument.back() == ']';
+    return looksLikeList || argument.starts_with(kBracketGuard) ? kBracketGuard + argument : argument;
+}
+
+// A validator sees every value first.
+CLI::Option* unguarding(CLI::Option* option, TextCheck check = {})
+{
+    const auto unguard = [check = std::move(check)](std::string& text) {
+        if (text.size() >= 2 && text[0] == kBracketGuard && (text[1] == '[' || text[1] == kBracketGuard))
+            text.erase(0, 1);
+        return check ? check(text) : std::string();
+    };
+    return option->transform(CLI::Validator(unguard, ""));
+}
+
+// The group of options that are words for another program, behind "--".
+constexpr const char* kWordsGroup = "Words";
+
+/// Help in the words of the grammar: one usage line for a verb, and one for each of its objects.
+class HelpFormatter : public CLI::Formatter {
+public:
+    HelpFormatter()
+    {
+        label("Positionals", "Arguments");
+        column_width(26);
+    }
+
+    std::string make_usage(const CLI::App* app, std::string name) const override
+    {
+        std::string usage = "Usage: " + usageLine(*app, name);
+        if (app->get_parent() != nullptr)
+            for (const CLI::App* object : app->get_subcommands([](const CLI::App*) { return true; }))
+                usage += "\n       " + usageLine(*object, name + " " + object->get_name());
+        return usage + "\n";
+    }
+
+    std::string make_help(const CLI::App* app, std::string name, CLI::AppFormatMode mode) const override
+    {
+        std::string help = CLI::Formatter::make_help(app, std::move(name), mode);
+        if (const std::size_t gap = help.find("\n\n\n"); gap != help.npos)
+            help.erase(gap, 1); // the group of words lists nothing, and has an empty line in front all the same
+        return help;
+    }
+
+private:
+    static std::string usageLine(const CLI::App& app, const std::string& name)
+    {
+        std::string line = name;
+        for (const CLI::Option* option : app.get_options([](const CLI::Option* one) { return one->get_positional(); }))
+            if (option->get_group() != kWordsGroup)
+                line += " " + option->get_name(true) + (option->get_expected_max() > 1 ? "..." : "");
+        line += app.get_parent() == nullptr ? " VERB [OBJECT] FILE... [options]" : " [options]";
+        for (const CLI::Option* words :
+             app.get_options([](const CLI::Option* one) { return one->get_group() == kWordsGroup; }))
+            line += " [-- " + words->get_name(true) + "...]";
+        return line;
+    }
+};
+
+} // namespace
+
+Argument& Argument::required()
+{
+    option_->required();
+    return *this;
+}
+
+Argument& Argument::label(const std::string& text)
+{
+    option_->option_text(text);
+    return *this;
+}
+
+Argument& Argument::describe(const std::string& text)
+{
+    option_->description(text);
+    return *this;
+}
+
+Argument& Argument::excludes(const Argument& other)
+{
+    option_->excludes(other.option_);
+    return *this;
+}
+
+Verb::Verb(const std::string& name, const std::string& description, const std::string& version)
+    : app_(std::make_shared<CLI::App>(description, name))
+{
+    app_->set_version_flag("--version", name + " " + version, "Print the version");
+    app_->set_help_flag("-h,--help", "Print this help");
+    app_->require_subcommand(0, 1);
+    app_->formatter(std::make_shared<HelpFormatter>());
+}
+
+Verb::Verb(std::shared_ptr<CLI::App> app, Work work) : app_(std::move(app)), work_(std::move(work))
+{
+    app_->group("Verbs");
+    app_->footer("");
+    app_->require_subcommand(0, 1);
+}
+
+Verb& Verb::addVerb(const std::string& name, const std::string& description, Work work)
+{
+    const std::shared_ptr<CLI::App> below(app_, app_->add_subcommand(name, description)); // which this one owns
+    return *verbs_.emplace_back(new Verb(below, std::move(work)));
+}
+
+void Verb::setFooter(const std::string& text)
+{
+    app_->footer(text);
+}
+
+Argument Verb::addFlag(const std::string& names, bool& value, const std::string& description)
+{
+    return Argument(*app_->add_flag(names, value, description));
+}
+
+Argument Verb::addFlag(const std::string& names, std::function<void()> act, const std::string& description)
+{
+    return Argument(*app_->add_flag_callback(names, std::move(act), description));
+}
+
+Argument Verb::addText(const std::string& names, TakeText take, const std::string& description, TextCheck check)
+{
+    CLI::Option* const option = app_->add_option_function<std::string>(names, std::move(take), description);
+    return Argument(*unguarding(option, std::move(check)));
+}
+
+Argument Verb::addText(const std::string& names, std::string& value, const std::string& description, TextCheck check)
+{
+    return Argument(*unguarding(app_->add_option(names, value, description), std::move(check)));
+}
+
+Argument Verb::addTexts(const std::string& names, std::vector<std::string>& values, const std::string& description,
+                        TextCheck check)
+{
+    return Argument(*unguarding(app_->add_option(names, values, description)->option_text("..."), std::move(check)));
+}
+
+Argument Verb::addWords(const std::string& name, std::vector<std::string>& words, const std::string& description)
+{
+    const Argument added = addTexts(name, words, description);
+    added.option_->group(kWordsGroup);
+    return added;
+}
+
+Argument Verb::addNumber(const std::string& names, TakeNumber take, std::pair<long, long> range,
+                         const std::string& description)
+{
+    CLI::Option* const option = app_->add_option_function<long>(names, std::move(take), description)->option_text("N");
+    return Argument(*unguarding(option)->check(CLI::Range(range.first, range.second).description("")));
+}
+
+Verb::Request Verb::parse(const std::vector<std::string>& arguments)
+{
+    std::vector<std::string> reversed; // as the parser takes them
+    std::transform(arguments.rbegin(), arguments.rend(), std::back_inserter(reversed), guarded);
+    try {
+        app_->parse(std::move(reversed));
+    } catch (const CLI::CallForHelp&) {
+        return {nullptr, help()};
+    } catch (const CLI::CallForVersion& version) {
+        return {nullptr, version.what() + std::string("\n")};
+    } catch (const CLI::ParseError& error) {
+        throw UsageError(error.what());
+    }
+    const Verb* verb = this;
+    while (!verb->app_->get_subcommands().empty())
+        verb = verb->find(verb->app_->get_subcommands().front()->get_name());
+    return {verb, {}};
+}
+
+bool Verb::isGiven(const std::string& name) const
+{
+    return app_->count(name) > 0;
+}
+
+const std::string& Verb::name() const
+{
+    return app_->get_name();
+}
+
+const Verb* Verb::find(const std::string& name) const
+{
+    const auto found = std::ranges::find(verbs_, name, [](const auto& verb) { return verb->name(); });
+    return found != verbs_.end() ? found->get() : nullptr;
+}
+
+std::string Verb::help(const std::string& above) const
+{
+    return app_->help(above);
+}

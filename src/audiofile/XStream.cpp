@@ -2,6 +2,7 @@
 
 #include "audiofile/ContainerDescriptions.h"
 #include "files/CFileRef.h"
+#include "platform/AudioFileService.h"
 #include "platform/ConvertingReader.h"
 #include "platform/core/Status.h"
 

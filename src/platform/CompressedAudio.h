@@ -2,7 +2,8 @@
 // whatever else the decoder module reads.
 #pragma once
 
-#include "platform/AudioFileService.h"
+#include "platform/StreamDescription.h"
+#include "platform/URL.h"
 #include "platform/core/Bytes.h"
 
 #include <cstdint>

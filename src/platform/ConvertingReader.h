@@ -3,9 +3,11 @@
 // such file is met (platform/audio/DecoderModule.h).
 #pragma once
 
-#include "platform/AudioFileService.h"
 #include "platform/AudioHandle.h"
+#include "platform/PacketTable.h"
+#include "platform/StreamDescription.h"
 #include "platform/URL.h"
+#include "platform/core/Bytes.h"
 #include "platform/core/Error.h"
 
 #include <cstdint>
@@ -22,14 +24,6 @@ struct AudioBuffer {
     std::uint32_t byteSize = 0; // in: room; out: bytes read
     void* data = nullptr;
 };
-
-/// The frames of a decoded file that are sound; encoders put `priming` frames ahead of them and `remainder` behind.
-struct PacketTable {
-    std::int64_t validFrames = 0;
-    std::int32_t primingFrames = 0;
-    std::int32_t remainderFrames = 0;
-};
-static_assert(sizeof(PacketTable) == 16);
 
 /// Which channel is where: a tag, and with tag 0 a description for each channel, of which the first is here.
 struct ChannelLayout {

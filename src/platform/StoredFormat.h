@@ -4,7 +4,7 @@
 // draft of 1991-08-26, and of CAF the published format description, version 1.0.
 #pragma once
 
-#include "platform/AudioFileService.h"
+#include "platform/StreamDescription.h"
 #include "platform/core/Bytes.h"
 
 #include <cstdint>

@@ -1,6 +1,7 @@
 // Files of linear PCM that a test writes, and what a converting reader reads of them.
 #pragma once
 
+#include "platform/AudioFileService.h"
 #include "platform/ConvertingReader.h"
 #include "platform/core/Status.h"
 #include "support/TemporaryFolder.h"

@@ -1,7 +1,7 @@
 // What a container says of its samples: format, place, number.
 #pragma once
 
-#include "platform/AudioFileService.h"
+#include "platform/StreamDescription.h"
 #include "platform/audio/ChunkScanner.h"
 
 #include <cstdint>

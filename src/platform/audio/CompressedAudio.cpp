@@ -1,5 +1,6 @@
 #include "platform/CompressedAudio.h"
 
+#include "platform/AudioFileService.h"
 #include "platform/ConvertingReader.h"
 #include "platform/SystemCalls.h"
 #include "platform/core/Status.h"

@@ -1,7 +1,7 @@
 // Frames of linear PCM to another sample format and channel count, by the shared sample conversions.
 #pragma once
 
-#include "platform/AudioFileService.h"
+#include "platform/StreamDescription.h"
 
 #include <cstddef>
 #include <vector>

@@ -1,6 +1,7 @@
 // Linear PCM as a decoder: the packets of the audio-file service are the frames.
 #pragma once
 
+#include "platform/AudioFileService.h"
 #include "platform/audio/AudioDecoder.h"
 
 #include <memory>

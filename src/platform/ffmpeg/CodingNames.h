@@ -1,7 +1,7 @@
 // The system's names of codings and files beside FFmpeg's.
 #pragma once
 
-#include "platform/AudioFileService.h"
+#include "platform/StreamDescription.h"
 
 #include <string_view>
 

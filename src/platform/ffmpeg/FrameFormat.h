@@ -1,7 +1,7 @@
 // Frames as decoders give them, and as they are handed out: interleaved and packed, in the processor's byte order.
 #pragma once
 
-#include "platform/AudioFileService.h"
+#include "platform/StreamDescription.h"
 
 #include <cstddef>
 #include <cstdint>

@@ -1,5 +1,6 @@
 #include "platform/packets/AudioCookie.h"
 
+#include "platform/AudioHandle.h"
 #include "platform/core/ByteReader.h"
 #include "platform/core/Status.h"
 

@@ -3,7 +3,7 @@
 // configuration of ALAC.
 #pragma once
 
-#include "platform/AudioFileService.h"
+#include "platform/StreamDescription.h"
 #include "platform/core/Bytes.h"
 
 #include <cstdint>

@@ -2,8 +2,9 @@
 // file says of its frames is so known, exactly, without a decoder; a module's decoder takes the packets from here.
 #pragma once
 
-#include "platform/AudioFileService.h"
-#include "platform/ConvertingReader.h"
+#include "platform/AudioHandle.h"
+#include "platform/PacketTable.h"
+#include "platform/StreamDescription.h"
 #include "platform/core/Bytes.h"
 
 #include <cstddef>

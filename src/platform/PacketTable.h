@@ -1,0 +1,16 @@
+// Which of the frames that packets decode to are sound.
+#pragma once
+
+#include <cstdint>
+
+namespace platform {
+
+/// The frames of a decoded file that are sound; encoders put `priming` frames ahead of them and `remainder` behind.
+struct PacketTable {
+    std::int64_t validFrames = 0;
+    std::int32_t primingFrames = 0;
+    std::int32_t remainderFrames = 0;
+};
+static_assert(sizeof(PacketTable) == 16);
+
+} // namespace platform

@@ -1,5 +1,5 @@
 // Samples to floats and back: 256 KiB of samples, in the cache.
-#include "platform/SampleConversion.h"
+#include "media/samples/SampleConversion.h"
 
 #include <benchmark/benchmark.h>
 

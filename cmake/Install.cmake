@@ -17,6 +17,18 @@ foreach(room platform/core platform files loops/tagging audiofile files/registry
     file(GLOB headers CONFIGURE_DEPENDS ${PROJECT_SOURCE_DIR}/src/${room}/*.h)
     install(FILES ${headers} DESTINATION ${CMAKE_INSTALL_INCLUDEDIR}/KTFiles/${room} COMPONENT development)
 endforeach()
+# Of what knows sound, the services and the types that they speak in; the test house.arrows reads this list too.
+set(media_headers
+    media/samples/SampleConversion.h media/samples/SampleExtremes.h media/samples/StreamDescription.h
+    media/containers/AudioHandle.h media/containers/StoredFormat.h
+    media/packets/PacketTable.h
+    media/decoding/CompressedAudio.h media/decoding/ConvertingReader.h
+    media/userdata/AudioFileService.h)
+foreach(header IN LISTS media_headers)
+    cmake_path(GET header PARENT_PATH room)
+    install(FILES ${PROJECT_SOURCE_DIR}/src/${header} DESTINATION ${CMAKE_INSTALL_INCLUDEDIR}/KTFiles/${room}
+        COMPONENT development)
+endforeach()
 
 set(package_folder ${CMAKE_INSTALL_LIBDIR}/cmake/KTFiles)
 install(EXPORT KTFilesTargets NAMESPACE KTFiles:: DESTINATION ${package_folder} COMPONENT development)

@@ -1,7 +1,7 @@
 // A disk of one file in memory, for fuzz targets that open audio files, and the audio that must survive every edit.
 #pragma once
 
-#include "platform/AudioFileService.h"
+#include "media/userdata/AudioFileService.h"
 #include "platform/SystemCalls.h"
 
 #include <algorithm>

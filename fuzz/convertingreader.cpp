@@ -2,7 +2,7 @@
 // and the place of a read, the rest is the file. A read in the middle gives what the read of everything gives there.
 #include "MemoryDisk.h"
 
-#include "platform/ConvertingReader.h"
+#include "media/decoding/ConvertingReader.h"
 
 namespace {
 

@@ -2,7 +2,7 @@
 // packets that lie in the file, which read the same in any order.
 #include "MemoryDisk.h"
 
-#include "platform/packets/PacketSource.h"
+#include "media/packets/PacketSource.h"
 
 namespace {
 

@@ -1,7 +1,7 @@
 // AudioFileInfo describes an audio file: what its header says, and the loop metadata that hosts ask for most.
 #pragma once
 
-#include "platform/SampleConversion.h"
+#include "media/samples/SampleConversion.h"
 #include "platform/core/Export.h"
 #include "platform/core/FourCC.h"
 
@@ -70,9 +70,10 @@ struct KT_EXPORT AudioFileInfo {
 /// read that failed. `permission` is the mode that the file was opened with. The mark stays where it was.
 ///
 /// Compressed files outside the containers, MP3, AAC and M4A, are opened a second time by their path, and so not known
-/// in memory; what only the decoder module could describe is "fmt?" where it does not (platform/ConvertingReader.h says
-/// what to install). Of compressed data rate, channels and frames are what the file says, except for `bitsPerSample` 0
-/// and `dataOffset` 0: the number of frames is that which decoding gives, unless `framesAreStated`.
+/// in memory; what only the decoder module could describe is "fmt?" where it does not
+/// (media/decoding/ConvertingReader.h says what to install). Of compressed data rate, channels and frames are what the
+/// file says, except for `bitsPerSample` 0 and `dataOffset` 0: the number of frames is that which decoding gives,
+/// unless `framesAreStated`.
 KT_EXPORT std::int32_t GetAudioFileInfo(CFileIO& file, unsigned int permission, AudioFileInfo& info);
 
 /// Channels of a bus format; 0 for values outside 1 to 14.

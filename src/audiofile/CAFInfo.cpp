@@ -4,7 +4,7 @@
 #include "audiofile/ContainerWalk.h"
 
 #include "loops/tagging/ChunkIDs.h"
-#include "platform/CompressedAudio.h"
+#include "media/decoding/CompressedAudio.h"
 #include "platform/core/ByteReader.h"
 
 #include <optional>

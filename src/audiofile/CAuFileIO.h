@@ -4,7 +4,7 @@
 
 #include "audiofile/CChunkData.h"
 #include "files/CFileRef.h"
-#include "platform/AudioFileService.h"
+#include "media/userdata/AudioFileService.h"
 #include "platform/FileSystem.h"
 
 #include <cstdint>

@@ -1,7 +1,7 @@
 // The samples of CAuFileIO: in pieces, so that a file of any size costs the same memory.
 #include "audiofile/CAuFileIO.h"
 
-#include "platform/SampleConversion.h"
+#include "media/samples/SampleConversion.h"
 #include "platform/core/Status.h"
 
 #include <algorithm>

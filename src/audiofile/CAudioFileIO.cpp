@@ -5,7 +5,7 @@
 #include "audiofile/ContainerDescriptions.h"
 #include "audiofile/FileWindow.h"
 #include "files/CFileUtil.h"
-#include "platform/ConvertingReader.h"
+#include "media/decoding/ConvertingReader.h"
 #include "platform/SystemCalls.h"
 
 #include <algorithm>

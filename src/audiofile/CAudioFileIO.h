@@ -6,7 +6,7 @@
 #include "audiofile/CChunkData.h"
 #include "audiofile/ContainerHeaders.h"
 #include "files/CFileIO.h"
-#include "platform/AudioFileService.h"
+#include "media/userdata/AudioFileService.h"
 #include "platform/ContentType.h"
 #include "platform/core/Error.h"
 

@@ -2,7 +2,7 @@
 #include "audiofile/CAudioFileIO.h"
 
 #include "audiofile/ContainerDescriptions.h"
-#include "platform/ConvertingReader.h"
+#include "media/decoding/ConvertingReader.h"
 
 #include <algorithm>
 #include <limits>

@@ -1,8 +1,8 @@
 // Compressed audio outside the chunked containers. Published source of FLAC: RFC 9639.
 #include "audiofile/ContainerDescriptions.h"
 
-#include "platform/CompressedAudio.h"
-#include "platform/FLACEnd.h"
+#include "media/decoding/CompressedAudio.h"
+#include "media/packets/FLACEnd.h"
 #include "platform/core/ByteReader.h"
 
 #include <algorithm>

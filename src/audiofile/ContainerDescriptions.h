@@ -5,7 +5,7 @@
 #include "audiofile/ChunkWalk.h"
 #include "audiofile/FileWindow.h"
 #include "loops/tagging/LoopTiming.h"
-#include "platform/StoredFormat.h"
+#include "media/containers/StoredFormat.h"
 
 #include <cstdint>
 #include <functional>

@@ -2,8 +2,8 @@
 
 #include "audiofile/ContainerDescriptions.h"
 #include "files/CFileRef.h"
-#include "platform/AudioFileService.h"
-#include "platform/ConvertingReader.h"
+#include "media/decoding/ConvertingReader.h"
+#include "media/userdata/AudioFileService.h"
 #include "platform/core/Status.h"
 
 #include <bit>

@@ -77,8 +77,8 @@ KT_EXPORT int32_t XStreamOpenWithFileRef(const CFileRef* ref, uint32_t flags, ui
 /// Opens a file by its path. Without a client format (null) frames come as near to the file's own format as they can
 /// be; without one the layout is not looked at. Positions and counts are frames of the client format's rate, where
 /// "#frm" counts the file's. On failure `*outStream` is null. "fmt?" for what cannot be decoded, or not to the client
-/// format, both also for want of the decoder module (platform/ConvertingReader.h); -66566 for an MP3 file without a
-/// valid frame, unless bit 0 of `flags` is set.
+/// format, both also for want of the decoder module (media/decoding/ConvertingReader.h); -66566 for an MP3 file without
+/// a valid frame, unless bit 0 of `flags` is set.
 KT_EXPORT int32_t XStreamOpen(const char* path, uint32_t flags, uint32_t reserved1, uint32_t reserved2,
                               const XStreamDescription* clientFormat, const XStreamChannelLayout* clientLayout,
                               XStreamRef* outStream);
@@ -99,7 +99,8 @@ KT_EXPORT int32_t XStreamWritePackets(XStreamRef stream, XStreamReadRequest* req
 /// "pcnt", "doff"); a stream is none of its files, -50. Either result may be null.
 KT_EXPORT int32_t XStreamGetPropertyInfo(XStreamRef stream, uint32_t id, uint32_t* outSize, uint32_t* outWritable);
 /// "#fmt": the type code of the file, 4 bytes ("!siz" for another size), "AIFF" for AIFC. Others are properties of the
-/// reader (platform/ConvertingReader.h), or else of its underlying file. `*ioSize` is the room, then the value's size.
+/// reader (media/decoding/ConvertingReader.h), or else of its underlying file. `*ioSize` is the room, then the value's
+/// size.
 KT_EXPORT int32_t XStreamGetProperty(XStreamRef stream, uint32_t id, uint32_t* ioSize, void* outData);
 /// Sets a property of the reader; what it does not have goes to the audio-file service, with the handle as it is.
 KT_EXPORT int32_t XStreamSetProperty(XStreamRef stream, uint32_t id, uint32_t size, const void* data);

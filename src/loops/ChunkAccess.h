@@ -1,7 +1,7 @@
 // The abstract bases of what moves one chunk between an open audio file and its data object.
 #pragma once
 
-#include "platform/AudioFileService.h"
+#include "media/userdata/AudioFileService.h"
 
 /// Each holds, without owning them, the open file and the chunk that made it; both outlive it. A platform call that
 /// fails ends the step and leaves the data object as it was.

@@ -2,7 +2,7 @@
 #pragma once
 
 #include "loops/VireoLoopChunks.h"
-#include "platform/AudioFileService.h"
+#include "media/userdata/AudioFileService.h"
 #include "platform/URL.h"
 
 #include <memory>

@@ -2,7 +2,7 @@
 #pragma once
 
 #include "loops/tagging/ChunkIDs.h"
-#include "platform/AudioFileService.h"
+#include "media/userdata/AudioFileService.h"
 #include "platform/core/Bytes.h"
 
 #include <optional>

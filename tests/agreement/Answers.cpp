@@ -3,7 +3,7 @@
 #include "audiofile/CAudioFileIO.h"
 #include "audiofile/XStream.h"
 #include "loops/overview/OverviewBlock.h"
-#include "platform/ConvertingReader.h"
+#include "media/decoding/ConvertingReader.h"
 #include "platform/core/Status.h"
 
 #include <cmath>

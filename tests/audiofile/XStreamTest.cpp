@@ -5,7 +5,7 @@
 #include "AllocationCount.h"
 #include "SoundFile.h"
 #include "audiofile/XStreamSaver.h"
-#include "platform/AudioFileService.h"
+#include "media/userdata/AudioFileService.h"
 #include "platform/core/Packed.h"
 #include "platform/core/Status.h"
 #include "support/FakeDecoder.h"

@@ -1,4 +1,5 @@
-"""Checks that every #include between rooms follows an arrow of the design, and that no public header shows the system.
+"""Checks that every #include between rooms follows an arrow of the design, that no room comes back to itself, that classes are
+defined where they are declared, and that no public header shows the system.
 
 A shared include root enforces nothing, so this test does. Usage: check_arrows.py SOURCE_ROOT
 """
@@ -11,24 +12,28 @@ import sys
 ARROWS = {
     "platform/core": set(),
     "platform": {"platform/core"},
+    "media/samples": {"platform"},
+    "media/containers": {"media/samples", "platform"},
+    "media/packets": {"media/containers", "platform"},
+    "media/userdata": {"media/containers", "platform"},
+    "media/decoding": {"media/packets", "media/userdata", "platform"},
+    "media/ffmpeg": {"media/decoding"},
     "files": {"platform"},
     "loops/tagging": {"platform/core"},
-    "audiofile": {"files", "loops/tagging", "platform"},
-    "loops": {"audiofile", "files", "loops/tagging", "platform"},
-    "loops/overview": {"audiofile", "files", "platform"},
+    "audiofile": {"files", "loops/tagging", "media/decoding", "platform"},
+    "loops": {"audiofile", "files", "loops/tagging", "media/decoding", "platform"},
+    "loops/overview": {"audiofile", "files", "media/samples", "platform"},
     "adm": {"platform"},
     "project": {"files", "platform"},
     "coordination": {"platform"},
     "files/registry": {"audiofile"},
 }
-# Implementation folder -> the folders whose implementation it may know too.
-INSIDERS = {
-    "platform/audio": {"platform/packets"},
-    "platform/packets": {"platform/audio"},
-    "platform/ffmpeg": {"platform/audio", "platform/packets"},
-}
 # Of the command, the one source that knows the parser of its command line.
 PARSER, PARSER_USER = "<CLI/", "tool/shared/arguments/Verb.cpp"
+# Members that a room above their class's own defines: overviews and tempo are none of a container's business.
+MEMBERS_ABOVE = {("CAudioFileIO", "loops"), ("CAudioFileIO", "loops/overview")}
+CLASS = re.compile(r"^(?:class|struct)\s+(?:KT_EXPORT\s+)?(\w+)(?:\s+final)?\s*(?::[^;{]*)?\{", re.MULTILINE)
+MEMBER = re.compile(r"^(?![ \t#/}])[^;=\n]*?\b(\w+)::~?\w+\([^;]*$", re.MULTILINE)
 SYSTEM_HEADER = re.compile(r"<(sys/|linux/|unistd|fcntl|libxml/|uriparser/|zlib|sha2|iconv|pwd|dirent|errno\.h)")
 INCLUDE = re.compile(r'^\s*#\s*include\s+(?:"([^"]+)"|(<[^>]+>))', re.MULTILINE)
 
@@ -50,6 +55,33 @@ def reachable(room):
     return seen
 
 
+def circles():
+    """Rooms that come back to themselves by way of others."""
+    for room, targets in ARROWS.items():
+        if any(room in reachable(target) for target in targets):
+            yield f"room {room} includes itself by way of another"
+
+
+def classes_of(root):
+    """Class -> the rooms whose headers define it."""
+    classes = {}
+    for header in root.rglob("*.h"):
+        room = room_of(header.relative_to(root).as_posix())
+        for name in CLASS.findall(header.read_text(encoding="utf-8")):
+            classes.setdefault(name, set()).add(room)
+    return classes
+
+
+def strange_members(source, root, classes):
+    """Members that a source defines of a class that another room declares."""
+    relative = source.relative_to(root).as_posix()
+    room = room_of(relative)
+    for name in sorted(set(MEMBER.findall(source.read_text(encoding="utf-8")))):
+        rooms = classes.get(name)
+        if rooms and room not in rooms and (name, room) not in MEMBERS_ABOVE:
+            yield f"src/{relative}: defines members of {name}, which {', '.join(sorted(rooms))} declares"
+
+
 def problems_of(source, root):
     relative = source.relative_to(root).as_posix()
     room = room_of(relative)
@@ -64,9 +96,8 @@ def problems_of(source, root):
         target = room_of(ours)
         if target not in reachable(room):
             yield f"src/{relative}: room {room} may not include {ours}"
-        implementation = ours.count("/") > room_depth(target) if target == "platform" else False
-        home, owner = relative.rsplit("/", 1)[0], ours.rsplit("/", 1)[0]
-        if implementation and owner != home and owner not in INSIDERS.get(home, ()):
+        implementation = target == "platform" and ours.count("/") > room_depth(target)
+        if implementation and relative.rsplit("/", 1)[0] != ours.rsplit("/", 1)[0]:
             yield f"src/{relative}: {ours} belongs to an implementation"
 
 
@@ -97,19 +128,26 @@ def tool_problems(source, top, public):
 def main():
     top = pathlib.Path(sys.argv[1])
     root = top / "src"
-    problems, count = [], 0
+    problems, count = list(circles()), 0
+    classes = classes_of(root)
     for source in sorted([*root.rglob("*.h"), *root.rglob("*.cpp")]):
         count += 1
         problems += problems_of(source, root)
-    public = {
+        if source.suffix == ".cpp":
+            problems += strange_members(source, root, classes)
+    installed = (top / "cmake" / "Install.cmake").read_text(encoding="utf-8")
+    media = set(re.search(r"set\(media_headers\s+([^)]*)\)", installed)[1].split())
+    public = media | {
         header.relative_to(root).as_posix()
         for room in ARROWS
+        if not room.startswith("media/")
         for header in (root / room).glob("*.h")
     }
     for folder in ("tool", "examples"):
         for source in sorted([*(top / folder).rglob("*.h"), *(top / folder).rglob("*.cpp")]):
             count += 1
             problems += tool_problems(source, top, public)
+    problems += [f"cmake/Install.cmake: {header} is not there" for header in media if not (root / header).exists()]
     if count == 0:
         problems.append("no sources found")
     print("\n".join(problems) or f"{count} files, every include along an arrow")

@@ -2,7 +2,7 @@
 #pragma once
 
 #include "loops/VireoLoopChunksManager.h"
-#include "platform/AudioContainers.h"
+#include "media/AudioContainers.h"
 
 #include <map>
 #include <string>

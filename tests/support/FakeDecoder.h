@@ -2,8 +2,8 @@
 // second channel. Gives at most 7 frames a call, as decoders of packets do.
 #pragma once
 
-#include "platform/audio/AudioDecoder.h"
-#include "platform/audio/DecoderModule.h"
+#include "media/decoding/AudioDecoder.h"
+#include "media/decoding/DecoderModule.h"
 #include "platform/core/Status.h"
 
 #include <algorithm>

@@ -2,7 +2,7 @@
 #pragma once
 
 #include "audiofile/AudioFileInfo.h"
-#include "platform/AudioFileService.h"
+#include "media/userdata/AudioFileService.h"
 
 #include <cstdint>
 #include <span>

@@ -1,7 +1,7 @@
 #include "tool/decode/DecodeSource.h"
 
 #include "audiofile/BusFormats.h"
-#include "platform/SampleExtremes.h"
+#include "media/samples/SampleExtremes.h"
 #include "tool/shared/access/FileAccess.h"
 #include "tool/shared/input/InputFile.h"
 #include "tool/shared/output/ClockTime.h"

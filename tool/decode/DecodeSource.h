@@ -1,7 +1,7 @@
 // An audio file of any format as the sound that `ktfiles decode` was asked for.
 #pragma once
 
-#include "platform/ConvertingReader.h"
+#include "media/decoding/ConvertingReader.h"
 #include "tool/decode/DecodeFormat.h"
 #include "tool/shared/output/ClockTime.h"
 

@@ -1,8 +1,8 @@
 #include "loops/overview/AudioRepresentation.h"
 
 #include "audiofile/CAudioFileIO.h"
+#include "media/samples/SampleExtremes.h"
 #include "platform/Log.h"
-#include "platform/SampleExtremes.h"
 
 #include <algorithm>
 #include <limits>

@@ -1,6 +1,6 @@
 #include "loops/overview/MDOverview.h"
 
-#include "platform/SampleExtremes.h"
+#include "media/samples/SampleExtremes.h"
 
 #include <algorithm>
 #include <array>

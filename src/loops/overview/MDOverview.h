@@ -2,7 +2,7 @@
 #pragma once
 
 #include "loops/overview/OverviewBlock.h"
-#include "platform/SampleConversion.h"
+#include "media/samples/SampleConversion.h"
 
 #include <cstdint>
 

@@ -1,0 +1,105 @@
+#include "media/containers/AudioDescription.h"
+
+#include "media/containers/StoredFormat.h"
+#include "platform/core/Packed.h"
+#include "platform/core/Status.h"
+
+#include <algorithm>
+#include <cmath>
+
+namespace platform {
+
+namespace {
+
+/// The first bytes of a chunk's body, at most `most`; empty when it has fewer than `least`.
+Bytes bodyOf(const BodyReader& readBody, const Chunk* chunk, std::size_t least, std::size_t most)
+{
+    if (chunk == nullptr || chunk->size < least)
+        return {};
+    Bytes body(static_cast<std::size_t>(std::min<std::uint64_t>(chunk->size, most)));
+    if (readBody(*chunk, body.data(), body.size()) != kStatusOK)
+        return {};
+    return body;
+}
+
+std::optional<StoredFormat> readFormat(const BodyReader& readBody, const ContainerLayout& layout)
+{
+    const FourCC id = layout.kind == ContainerKind::riff  ? fourCC("fmt ")
+                      : layout.kind == ContainerKind::iff ? fourCC("COMM")
+                                                          : fourCC("desc");
+    const Bytes body = bodyOf(readBody, layout.find(id), 0, kMostOfStoredFormat);
+    return layout.kind == ContainerKind::riff  ? storedFormatOfWAVE(body)
+           : layout.kind == ContainerKind::iff ? storedFormatOfAIFF(body, layout.fileType == fourCC("AIFC"))
+                                               : storedFormatOfCAF(body);
+}
+
+/// The packets that a CAF file of packets in differing sizes counts in its packet table.
+std::uint64_t packetsOfTable(const BodyReader& readBody, const ContainerLayout& layout)
+{
+    const Bytes body = bodyOf(readBody, layout.find(fourCC("pakt")), 24, 24);
+    return body.empty() ? 0 : static_cast<std::uint64_t>(std::max<std::int64_t>(0, loadBE<std::int64_t>(body.data())));
+}
+
+/// Finds the samples in "data" or "SSND". AIFF that counts no frames need have none.
+std::int32_t locateData(const BodyReader& readBody, const ContainerLayout& layout, const StoredFormat& format,
+                        AudioDescription& description)
+{
+    constexpr std::uint64_t editCountSize = 4;
+    const Chunk* data = layout.find(layout.audioDataId());
+    if (data == nullptr)
+        return layout.kind == ContainerKind::iff && format.countedPackets == 0 ? kStatusOK : kStatusIOError;
+    std::uint64_t lead = 0; // ahead of the samples, in the body
+    if (layout.kind == ContainerKind::caf)
+        lead = std::min(editCountSize, data->size);
+    if (layout.kind == ContainerKind::iff)
+        lead = soundDataLead(data->size, bodyOf(readBody, data, 4, 4));
+    description.dataOffset = layout.bodyOf(*data) + lead;
+    description.byteCount = data->size - lead;
+    return kStatusOK;
+}
+
+} // namespace
+
+std::int32_t describeAudio(const BodyReader& readBody, const ContainerLayout& layout, AudioDescription& description)
+{
+    description = {};
+    const auto stored = readFormat(readBody, layout);
+    if (!stored)
+        return kStatusIOError;
+    const StreamDescription& format = description.format = stored->stream;
+    if (format.channelsPerFrame == 0 || (format.isLinearPCM() && format.bytesPerPacket == 0))
+        return kStatusIOError;
+    if (const std::int32_t located = locateData(readBody, layout, *stored, description); located != kStatusOK)
+        return located;
+    const std::uint64_t counted = stored->countedPackets;
+    if (format.bytesPerPacket > 0) {
+        description.packetCount = description.byteCount / format.bytesPerPacket;
+        if (counted > 0 && counted < description.packetCount && format.isLinearPCM()) {
+            description.packetCount = counted;
+            description.byteCount = counted * format.bytesPerPacket;
+        }
+    } else {
+        description.packetCount = layout.kind == ContainerKind::caf ? packetsOfTable(readBody, layout) : counted;
+    }
+    return kStatusOK;
+}
+
+double loadExtended(const std::byte* bytes)
+{
+    const auto head = loadBE<std::uint16_t>(bytes);
+    const auto mantissa = loadBE<std::uint64_t>(bytes + 2);
+    const int exponent = (head & 0x7FFF) - 16383;
+    if (mantissa == 0 || exponent > 1023 || exponent < -1022 || (head & 0x8000))
+        return 0;
+    return std::ldexp(static_cast<double>(mantissa), exponent - 63);
+}
+
+void storeExtended(std::byte* bytes, double value)
+{
+    int exponent = 0;
+    const double fraction = std::frexp(value, &exponent); // [0.5, 1)
+    storeBE(bytes, static_cast<std::uint16_t>(value > 0 ? exponent - 1 + 16383 : 0));
+    storeBE(bytes + 2, value > 0 ? static_cast<std::uint64_t>(std::ldexp(fraction, 64)) : std::uint64_t{0});
+}
+
+} // namespace platform

@@ -1,0 +1,141 @@
+#include "media/decoding/CompressedAudio.h"
+
+#include "media/decoding/ConvertingReader.h"
+#include "media/packets/PacketFile.h"
+#include "media/packets/PacketSource.h"
+#include "media/packets/TagExtents.h"
+#include "media/userdata/AudioFileService.h"
+#include "platform/SystemCalls.h"
+#include "platform/core/Status.h"
+
+#include <algorithm>
+#include <string_view>
+
+namespace platform {
+
+namespace {
+
+/// How files begin that are left to the module: with these bytes, of which the bits of the mask count.
+struct Beginning {
+    std::size_t offset;
+    std::string_view bytes;
+    FourCC fileType;
+    std::string_view mask = {}; // empty: all
+};
+constexpr std::string_view kFrame = "\xFF\xF6"; // sync and layer of an MPEG frame
+constexpr Beginning kBeginnings[] = {
+    {0, "OggS", fourCC("ogg ")},
+    {0, "\x30\x26\xB2\x75", fourCC("asf ")}, // by the start of its identifier
+    {0, ".snd", fourCC("NeXT")},
+    {0, "wvpk", fourCC("wvpk")},
+    {0, "MAC ", fourCC("ape ")},
+    {0, "TTA1", fourCC("tta ")},
+    {0, "tBaK", fourCC("tak ")},
+    {0, "riff\x2E\x91\xCF\x11", fourCC("W64f")},
+    {0, "\x1A\x45\xDF\xA3", fourCC("mkv ")},
+    {0, "\x0B\x77", fourCC("ac-3")},
+    {0, "fLaC", fourCC("flac")},             // behind a tag
+    {0, "\xFF\xF0", fourCC("adts"), kFrame}, // rates at which a decoder may double them
+    {0, "\xFF\xF4", fourCC("MPG2"), kFrame},
+    {0, "\xFF\xF2", fourCC("MPG3"), kFrame},
+    {0, "Creative Voice", fourCC("voc ")},
+    {0, "#!AMR", fourCC("amrf")},
+    {0, "NIST_1A", fourCC("nist")},
+    {0, "MP+", fourCC("mpc ")},
+    {0, "MPCK", fourCC("mpc8")},
+    {0, "ajkg", fourCC("shn ")},
+    {0, "DSD ", fourCC("dsf ")},
+    {0, "\x7F\xFE\x80\x01", fourCC("dts ")},
+    {0, "FLV\x01", fourCC("flv ")},
+    {0, ".RMF", fourCC("rm  ")},
+    {8, "AVI ", fourCC("AVI ")},
+    {8, "XWMA", fourCC("xwma")},
+    {8, "8SVX", fourCC("iff ")},
+    {4, "ftyp", fourCC("mp4f")}, // one that the library does not find its way in
+    {4, "moov", fourCC("mp4f")},
+    {4, "mdat", fourCC("mp4f")},
+};
+
+bool begins(BytesView start, const Beginning& beginning)
+{
+    if (start.size() < beginning.offset + beginning.bytes.size())
+        return false;
+    for (std::size_t i = 0; i < beginning.bytes.size(); ++i) {
+        const auto mask = static_cast<unsigned char>(beginning.mask.empty() ? '\xFF' : beginning.mask[i]);
+        if (((std::to_integer<unsigned char>(start[beginning.offset + i]) ^
+              static_cast<unsigned char>(beginning.bytes[i])) &
+             mask) != 0)
+            return false;
+    }
+    return true;
+}
+
+FourCC fileTypeOf(BytesView start)
+{
+    const auto* const found =
+        std::ranges::find_if(kBeginnings, [&](const Beginning& beginning) { return begins(start, beginning); });
+    return found != std::end(kBeginnings) ? found->fileType : 0;
+}
+
+/// The first bytes behind the tags that a stream of frames may have ahead of it.
+Bytes startBehindTags(const URL& url, BytesView start)
+{
+    constexpr std::size_t wanted = 16;
+    FileStatus found;
+    const bool isTagged = start.size() >= 3 && textOf(start.first(3)) == "ID3";
+    const int descriptor = isTagged ? systemCalls().openFile(url.posixPath().c_str(), OpenFor::reading, &found) : -1;
+    if (descriptor < 0)
+        return {start.begin(), start.end()};
+    PacketFile file(descriptor, static_cast<std::uint64_t>(std::max<std::int64_t>(found.size, 0)));
+    const BytesView bytes = file.at(endOfLeadingTags(file), wanted);
+    return {bytes.begin(), bytes.end()};
+}
+
+/// As the module names it, where it does.
+FourCC fileTypeOf(ConvertingReader& reader, FourCC fileType)
+{
+    AudioHandle* file = nullptr;
+    std::uint32_t size = sizeof file;
+    if (reader.property(ConvertingReader::audioFileProperty, size, &file) == kStatusOK && file != nullptr) {
+        size = sizeof fileType;
+        FourCC found = 0;
+        if (file->property(AudioFile::fileTypeProperty, size, &found) == kStatusOK && found != 0)
+            return found;
+    }
+    return fileType;
+}
+
+} // namespace
+
+std::int32_t describePackets(const URL& url, CompressedAudio& audio)
+{
+    audio = {};
+    std::int32_t status = kStatusOK;
+    const auto packets = openPacketSource(url.posixPath(), &status);
+    if (!packets)
+        return status;
+    audio = {packets->fileType(), packets->format(),
+             static_cast<std::uint64_t>(std::max<std::int64_t>(packets->table().validFrames, 0))};
+    return kStatusOK;
+}
+
+std::int32_t describeCompressedAudio(const URL& url, BytesView start, CompressedAudio& audio)
+{
+    std::int32_t status = describePackets(url, audio);
+    if (status != AudioHandle::kFormatNotSupported)
+        return status;
+    audio.fileType = fileTypeOf(startBehindTags(url, start));
+    if (audio.fileType == 0)
+        return kStatusParameterError;
+    const auto reader = ConvertingReader::open(url, &status);
+    if (reader) {
+        audio.fileType = fileTypeOf(*reader, audio.fileType);
+        audio.format = reader->fileFormat();
+        audio.format.sampleRate = reader->clientFormat().sampleRate;
+        audio.format.channelsPerFrame = reader->clientFormat().channelsPerFrame;
+        audio.frames = reader->frameCount();
+    }
+    return status;
+}
+
+} // namespace platform

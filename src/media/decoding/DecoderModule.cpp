@@ -1,0 +1,110 @@
+#include "media/decoding/DecoderModule.h"
+
+#include "platform/core/Status.h"
+
+#include <cmath>
+#include <dlfcn.h>
+
+namespace platform {
+
+namespace {
+
+constexpr const char* kModule = "ktfiles/libktfiles-decoders.so";
+constexpr const char* kSymbol = "ktfiles_decoderModule";
+constexpr const char* kPackage = "libktfiles-ffmpeg";
+
+const DecoderModule* replacement = nullptr;
+
+/// The folder of the library, or of the program that it is linked into, with a slash; empty when it is not known.
+std::string ownFolder()
+{
+    Dl_info info;
+    if (dladdr(reinterpret_cast<const void*>(&openWithDecoderModule), &info) == 0 || info.dli_fname == nullptr)
+        return {};
+    const std::string path = info.dli_fname;
+    return path.substr(0, path.rfind('/') + 1);
+}
+
+/// Null when there is no module. Once loaded it stays: its decoders are anybody's.
+const DecoderModule* loadModule()
+{
+    const std::string folder = ownFolder();
+    if (folder.empty()) // what follows would be looked for in the system's folders
+        return nullptr;
+    void* library = dlopen((folder + kModule).c_str(), RTLD_NOW | RTLD_LOCAL | RTLD_NODELETE);
+    return library != nullptr ? static_cast<const DecoderModule*>(dlsym(library, kSymbol)) : nullptr;
+}
+
+/// No way was found: says so in `status`, which may have a reason of its own, and in `error`.
+void failWith(std::int32_t& status, Error* error, const char* reason)
+{
+    if (status == kStatusOK)
+        status = AudioHandle::kFormatNotSupported;
+    fail(error, ErrorDomain::status, status, status == AudioHandle::kFormatNotSupported ? reason : StatusText(status));
+}
+
+/// `what` is wanted and there is no module.
+void failWithoutModule(std::int32_t& status, Error* error, const std::string& what)
+{
+    status = AudioHandle::kFormatNotSupported;
+    fail(error, ErrorDomain::status, status, what + " " + kModule + " (install " + kPackage + ")");
+}
+
+} // namespace
+
+const DecoderModule* decoderModule()
+{
+    const auto load = [] {
+        static const DecoderModule* const loaded = loadModule();
+        return loaded;
+    };
+    const DecoderModule* module = replacement != nullptr ? replacement : load();
+    return module != nullptr && module->version == DecoderModule::currentVersion ? module : nullptr;
+}
+
+void replaceDecoderModule(const DecoderModule* module)
+{
+    replacement = module;
+}
+
+std::unique_ptr<AudioDecoder> openWithDecoderModule(const std::string& path, std::int32_t& status, Error* error)
+{
+    const DecoderModule* module = decoderModule();
+    if (module == nullptr) {
+        failWithoutModule(status, error, "not linear PCM; other formats need");
+        return nullptr;
+    }
+    status = kStatusOK;
+    std::unique_ptr<AudioDecoder> decoder;
+    if (std::unique_ptr<PacketSource> packets = openPacketSource(path, &status))
+        decoder.reset(module->openPackets(packets.release(), &status));
+    else if (status == AudioHandle::kFormatNotSupported)
+        decoder.reset(module->openFile(path.c_str(), &status));
+    if (!decoder)
+        failWith(status, error, "no audio that can be decoded");
+    return decoder;
+}
+
+std::unique_ptr<Resampler> makeResampler(std::uint32_t channels, double fromRate, double toRate, std::int32_t& status,
+                                         Error* error)
+{
+    const auto isRate = [](double rate) {
+        return rate >= 1 && rate <= Resampler::kMaxRate && rate == std::floor(rate);
+    };
+    std::unique_ptr<Resampler> resampler;
+    status = kStatusOK;
+    if (isRate(fromRate) && isRate(toRate) && channels <= Resampler::kMaxChannels) {
+        const DecoderModule* module = decoderModule();
+        if (module == nullptr) {
+            failWithoutModule(status, error, "another sample rate needs");
+            return nullptr;
+        }
+        resampler.reset(module->makeResampler(channels, static_cast<std::uint32_t>(fromRate),
+                                              static_cast<std::uint32_t>(toRate), &status));
+    }
+    if (!resampler)
+        failWith(status, error, "a sample rate that cannot be converted to");
+    return resampler;
+}
+
+} // namespace platform

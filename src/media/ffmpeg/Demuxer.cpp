@@ -1,0 +1,153 @@
+#include "media/ffmpeg/Demuxer.h"
+
+#include "media/containers/AudioHandle.h"
+#include "media/ffmpeg/CodingNames.h"
+#include "platform/core/Status.h"
+
+#include <cstddef>
+#include <new>
+#include <vector>
+
+extern "C" {
+#include <libavformat/avformat.h>
+}
+
+namespace platform::ffmpeg {
+
+namespace {
+
+/// EINVAL is what a demultiplexer that is not to be used gives.
+std::int32_t statusOf(int error)
+{
+    const bool isSystemError = error > -4096 && error != AVERROR(EINVAL);
+    return isSystemError ? PosixErrorToOSErr(AVUNERROR(error)) : AudioHandle::kFormatNotSupported;
+}
+
+/// A kind that bytes by chance look like a little is taken only when the file's name says the same.
+bool isCredible(const AVFormatContext& context, const std::string& url)
+{
+    return context.probe_score >= AVPROBE_SCORE_RETRY ||
+           (context.iformat->extensions != nullptr && av_match_ext(url.c_str(), context.iformat->extensions) != 0);
+}
+
+/// A context without a word: the log raises a message's level by the number that the class of its context points to,
+/// which of demultiplexers is none; here it is what `opaque` holds. The level itself is the host's.
+AVFormatContext* makeSilentContext()
+{
+    static const AVClass silent = [] {
+        AVClass made = *avformat_get_class();
+        made.log_level_offset_offset = offsetof(AVFormatContext, opaque);
+        return made;
+    }();
+    AVFormatContext* const context = avformat_alloc_context();
+    if (context == nullptr)
+        throw std::bad_alloc();
+    context->av_class = &silent;
+    context->opaque = reinterpret_cast<void*>(std::intptr_t{kLogLevelOffset});
+    return context;
+}
+
+/// avformat_find_stream_info, with silent decoders for the streams that are known by now.
+int findStreamInfo(AVFormatContext& context)
+{
+    std::vector<AVDictionary*> options(context.nb_streams);
+    bool isSet = true;
+    for (AVDictionary*& ofStream : options)
+        isSet = isSet && av_dict_set_int(&ofStream, "log_level_offset", kLogLevelOffset, 0) >= 0;
+    const int result = isSet ? avformat_find_stream_info(&context, options.data()) : AVERROR(ENOMEM);
+    for (AVDictionary*& ofStream : options)
+        av_dict_free(&ofStream);
+    return result;
+}
+
+} // namespace
+
+Demuxer::Demuxer(const char* path, std::int32_t& status) : url_(std::string("file:") + path)
+{
+    status = open();
+}
+
+std::int32_t Demuxer::open()
+{
+    context_.reset();
+    FormatContext made(makeSilentContext());
+    AVDictionary* options = nullptr;
+    if (av_dict_set(&options, "protocol_whitelist", "file", 0) < 0 ||
+        av_dict_set(&options, "format_whitelist", usedDemuxers, 0) < 0)
+        throw std::bad_alloc();
+    AVFormatContext* context = made.release(); // which is freed when it cannot be opened
+    int result = avformat_open_input(&context, url_.c_str(), nullptr, &options);
+    av_dict_free(&options);
+    if (result < 0)
+        return statusOf(result);
+    FormatContext opened(context);
+    if (!isCredible(*opened, url_))
+        return AudioHandle::kFormatNotSupported;
+    result = findStreamInfo(*opened);
+    if (result < 0)
+        return statusOf(result);
+    stream_ = av_find_best_stream(opened.get(), AVMEDIA_TYPE_AUDIO, -1, -1, nullptr, 0);
+    if (stream_ < 0 || avcodec_find_decoder(opened->streams[stream_]->codecpar->codec_id) == nullptr)
+        return AudioHandle::kFormatNotSupported;
+    for (unsigned i = 0; i < opened->nb_streams; ++i)
+        if (static_cast<int>(i) != stream_)
+            opened->streams[i]->discard = AVDISCARD_ALL;
+    context_ = std::move(opened);
+    return kStatusOK;
+}
+
+const AVStream& Demuxer::stream() const
+{
+    return *context_->streams[stream_];
+}
+
+std::string_view Demuxer::name() const
+{
+    return context_->iformat->name;
+}
+
+std::string_view Demuxer::brand() const
+{
+    const AVDictionaryEntry* entry = av_dict_get(context_->metadata, "major_brand", nullptr, 0);
+    return entry != nullptr ? entry->value : std::string_view{};
+}
+
+bool Demuxer::read(AVPacket& packet, std::int32_t& status)
+{
+    status = kStatusOK;
+    for (int failures = 0; failures < 100;) {
+        const int result = av_read_frame(context_.get(), &packet);
+        if (result >= 0 && packet.stream_index == stream_ && packet.size > 0)
+            return true;
+        if (result >= 0)
+            av_packet_unref(&packet);
+        else if (result == AVERROR_EOF)
+            break;
+        else
+            ++failures;
+    }
+    const int error = context_->pb != nullptr ? context_->pb->error : 0; // which the end may hide
+    if (error < 0 && error != AVERROR_EOF)
+        status = statusOf(error);
+    return false;
+}
+
+bool Demuxer::seek(std::int64_t time)
+{
+    return av_seek_frame(context_.get(), stream_, time, AVSEEK_FLAG_BACKWARD) >= 0;
+}
+
+std::uint64_t Demuxer::size() const
+{
+    const std::int64_t size = context_->pb != nullptr ? avio_size(context_->pb) : 0;
+    return size > 0 ? static_cast<std::uint64_t>(size) : 0;
+}
+
+std::int32_t Demuxer::restart()
+{
+    const int stream = stream_;
+    const std::int32_t status = open();
+    return status == kStatusOK && stream_ != stream ? kStatusIOError : status;
+}
+
+} // namespace platform::ffmpeg

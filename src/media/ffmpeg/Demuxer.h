@@ -1,0 +1,42 @@
+// The packets of a file's audio as FFmpeg finds them.
+#pragma once
+
+#include "media/ffmpeg/Handles.h"
+
+#include <cstdint>
+#include <string>
+#include <string_view>
+
+struct AVStream;
+
+namespace platform::ffmpeg {
+
+/// Owns the file, and takes nothing from any other, nor from a network.
+class Demuxer {
+public:
+    /// isOpen() is false afterwards, with the status, when no audio is found that there is a decoder for.
+    Demuxer(const char* path, std::int32_t& status);
+
+    bool isOpen() const { return context_ != nullptr; }
+    const AVStream& stream() const;
+    std::string_view name() const;
+    /// What a movie says of its kind; else empty.
+    std::string_view brand() const;
+    /// False at the end, where the file is broken beyond a hundred tries, and where it cannot be read, with the status.
+    bool read(AVPacket& packet, std::int32_t& status);
+    /// To a packet at or before a time, in the stream's units, as well as the file lets it be found.
+    bool seek(std::int64_t time);
+    /// The file's length in bytes; 0 when it cannot be told.
+    std::uint64_t size() const;
+    /// To the first packet, in the state of a newly opened file.
+    std::int32_t restart();
+
+private:
+    std::int32_t open();
+
+    std::string url_;
+    FormatContext context_;
+    int stream_ = -1;
+};
+
+} // namespace platform::ffmpeg

@@ -1,0 +1,414 @@
+#include "media/ffmpeg/FileDecoder.h"
+
+#include "media/ffmpeg/CodingNames.h"
+#include "media/ffmpeg/FrameFormat.h"
+#include "platform/core/Status.h"
+
+#include <algorithm>
+#include <array>
+#include <utility>
+
+extern "C" {
+#include <libavcodec/avcodec.h>
+#include <libavcodec/codec_desc.h>
+#include <libavformat/avformat.h>
+}
+
+namespace platform::ffmpeg {
+
+namespace {
+
+/// For codings that build on what went before; 13 packets of MP3, four times what Opus asks for.
+constexpr std::uint64_t kWarmUp = 16384, kOpusWarmUp = 96000;
+/// Decoding so far costs less than finding a place in a file.
+constexpr std::uint64_t kReach = 32768;
+/// More than any coding makes of one byte: FLAC has 16 bytes and more for at most 65,535 frames.
+constexpr std::uint64_t kFramesPerByte = 8192;
+/// Times beyond are none.
+constexpr std::uint64_t kMostFrames = std::uint64_t{1} << 62;
+
+template <std::size_t N>
+bool isOneOf(std::string_view name, const std::array<std::string_view, N>& names)
+{
+    return std::find(names.begin(), names.end(), name) != names.end();
+}
+
+/// Demultiplexers whose times are those that the file states for each place in it.
+bool hasExactTimes(const Demuxer& demuxer)
+{
+    constexpr std::array<std::string_view, 6> exact{"flac", "ogg", "tta", "wv", "ape", "tak"};
+    const AVStream& stream = demuxer.stream();
+    return isOneOf(demuxer.name(), exact) && stream.time_base.num == 1 &&
+           stream.time_base.den == stream.codecpar->sample_rate;
+}
+
+/// Demultiplexers that cut one run of bytes into packets.
+bool isOneRun(const Demuxer& demuxer)
+{
+    constexpr std::array<std::string_view, 6> runs{"wav", "w64", "aiff", "au", "caf", "ircam"};
+    return isOneOf(demuxer.name(), runs);
+}
+
+std::uint64_t framesPerBlockOf(const AVCodecParameters& parameters)
+{
+    return parameters.block_align > 0 ? framesOfBlocks(parameters, parameters.block_align) : 0;
+}
+
+/// Every packet decodes by itself.
+bool isIndependent(const AVCodecParameters& parameters)
+{
+    if (parameters.codec_id == AV_CODEC_ID_GSM_MS) // blocks of one size, each of which needs those ahead
+        return false;
+    constexpr int both = AV_CODEC_PROP_INTRA_ONLY | AV_CODEC_PROP_LOSSLESS;
+    const AVCodecDescriptor* descriptor = avcodec_descriptor_get(parameters.codec_id);
+    return framesPerBlockOf(parameters) > 0 || (descriptor != nullptr && (descriptor->props & both) == both);
+}
+
+} // namespace
+
+std::unique_ptr<FileDecoder> FileDecoder::open(const char* path, std::int32_t& status)
+{
+    Demuxer demuxer(path, status);
+    if (!demuxer.isOpen())
+        return nullptr;
+    std::unique_ptr<CorrectionFile> corrections = CorrectionFile::beside(path, demuxer);
+    std::unique_ptr<FileDecoder> decoder(new FileDecoder(std::move(demuxer), std::move(corrections)));
+    status = decoder->begin();
+    if (status == kStatusOK)
+        status = decoder->describeAsDecoded();
+    return status == kStatusOK ? std::move(decoder) : nullptr;
+}
+
+FileDecoder::FileDecoder(Demuxer demuxer, std::unique_ptr<CorrectionFile> corrections)
+    : demuxer_(std::move(demuxer)),
+      corrections_(std::move(corrections)),
+      packet_(makePacket())
+{
+    const AVCodecParameters& parameters = *demuxer_.stream().codecpar;
+    framesPerBlock_ = isOneRun(demuxer_) ? framesPerBlockOf(parameters) : 0;
+    numbers_ = framesPerBlock_ > 0 ? Numbers::byPosition : hasExactTimes(demuxer_) ? Numbers::byTime : Numbers::byCount;
+    isPaged_ = demuxer_.name() == "ogg";
+    endsWithTime_ = isPaged_ && parameters.codec_id == AV_CODEC_ID_VORBIS;
+    // The low bits of "ima4" run on from the first packet to the last.
+    isChained_ = parameters.codec_id == AV_CODEC_ID_ADPCM_IMA_QT;
+    warmUp_ = isIndependent(parameters) ? 0 : parameters.codec_id == AV_CODEC_ID_OPUS ? kOpusWarmUp : kWarmUp;
+}
+
+/// Everything as at the first packet, the decoder too, whatever it keeps when it is flushed.
+std::int32_t FileDecoder::begin()
+{
+    const AVRational unit = numbers_ == Numbers::byTime ? demuxer_.stream().time_base : AVRational{0, 1};
+    std::int32_t status = kStatusOK;
+    codec_ = Codec::open(*demuxer_.stream().codecpar, unit.num, unit.den,
+                         endsWithTime_ ? Codec::Padding::kept : Codec::Padding::dropped, status);
+    expected_ = 0;
+    isNumbered_ = true;
+    hasGivenUp_ = false;
+    pending_.reset();
+    return status;
+}
+
+std::int32_t FileDecoder::restart()
+{
+    codec_.reset();
+    const std::int32_t status = demuxer_.restart();
+    if (corrections_)
+        corrections_->seek(0);
+    return status == kStatusOK ? begin() : status;
+}
+
+std::int32_t FileDecoder::describeAsDecoded()
+{
+    base_ = AV_NOPTS_VALUE;
+    Span span;
+    std::int32_t status = next(span);
+    if (status != kStatusOK)
+        return status;
+    if (span.start == kNever)
+        return kStatusIOError;
+    const auto frames = frameFormatOf(codec_->sourceBits(), decoded());
+    if (!frames)
+        return AudioHandle::kFormatNotSupported;
+    noteSpeakers();
+    const AVCodecParameters& parameters = *demuxer_.stream().codecpar;
+    const StreamDescription file =
+        fileFormatOf(parameters, codec_->sourceBits(), frames->sampleRate, frames->channelsPerFrame);
+    if (numbers_ == Numbers::byTime && decoded().sample_rate != parameters.sample_rate)
+        numbers_ = Numbers::byCount;
+    const bool isLayerII = parameters.codec_id == AV_CODEC_ID_MP2 && std::string_view(demuxer_.name()) == "mp3";
+    const FourCC fileType = isLayerII ? fourCC("MPG2") : fileTypeOf(demuxer_.name(), demuxer_.brand());
+    std::uint64_t count = 0;
+    if (status = countFrames(count); status != kStatusOK)
+        return status;
+    limit_ = count;
+    if (status = restart(); status != kStatusOK)
+        return status;
+    describe(fileType, file, *frames, 0, count, FileHandle::unknownCount);
+    if (const auto stated = SoundDigest::statedBy(*demuxer_.stream().codecpar)) // of the file opened again
+        noteChecksum(*stated, file.bitsPerChannel);
+    forget();
+    return kStatusOK;
+}
+
+/// Where numbers are exact anywhere, those of the last frames tell; else everything is decoded once.
+std::int32_t FileDecoder::countFrames(std::uint64_t& count)
+{
+    constexpr std::uint64_t tail = 1u << 16;
+    const AVStream& stream = demuxer_.stream();
+    const std::int64_t stated = stream.duration != AV_NOPTS_VALUE ? stream.duration : 0;
+    const auto length = static_cast<std::uint64_t>(std::max<std::int64_t>(stated, 0));
+    count = 0;
+    std::int32_t status = kStatusOK;
+    if (canLand() && length > 2 * tail && length < std::uint64_t{1} << 48 && land(length, tail))
+        status = decodeRest(count);
+    if (status == kStatusOK && count == 0)
+        status = countFromStart(count);
+    if (status == kStatusOK && numbers_ == Numbers::byTime && count / kFramesPerByte > demuxer_.size()) {
+        numbers_ = Numbers::byCount; // the times are no times
+        status = countFromStart(count);
+    }
+    if (endsWithTime_ && length > 0)
+        count = std::min(count, length);
+    // Where the file states it, the sound ends within the last block, or ahead of padding to 8 bytes (Wave64).
+    if (numbers_ == Numbers::byPosition && length < count && count - length < framesPerBlock_ + 8)
+        count = length;
+    return status;
+}
+
+std::int32_t FileDecoder::countFromStart(std::uint64_t& count)
+{
+    count = 0;
+    isCounting_ = numbers_ == Numbers::byCount;
+    std::int32_t status = restart();
+    if (status == kStatusOK)
+        status = decodeRest(count);
+    isCounting_ = false;
+    return status;
+}
+
+std::int32_t FileDecoder::decodeRest(std::uint64_t& end)
+{
+    for (Span span;;) {
+        if (const std::int32_t status = next(span); status != kStatusOK)
+            return status;
+        if (span.start == kNever)
+            return kStatusOK;
+        end = std::max(end, span.end);
+    }
+}
+
+/// The time of number 0, by the first frame that decodes. In a FLAC file that states its length times count from the
+/// first sample, whether its frame decodes or not.
+std::int64_t FileDecoder::startOf(const AVFrame& frame) const
+{
+    const bool countsFromZero = demuxer_.name() == "flac" && frame.pts < demuxer_.stream().duration;
+    return countsFromZero ? 0 : frame.pts - static_cast<std::int64_t>(expected_);
+}
+
+// Seeking.
+
+bool FileDecoder::canLand() const
+{
+    return numbers_ == Numbers::byPosition || (numbers_ == Numbers::byTime && base_ != AV_NOPTS_VALUE);
+}
+
+std::uint64_t FileDecoder::reach(std::uint64_t)
+{
+    return isChained_ ? kNever : kReach + warmUp_;
+}
+
+std::int32_t FileDecoder::startAt(std::uint64_t& number)
+{
+    constexpr int attempts = 5;
+    const bool isWhole = demuxer_.isOpen() && codec_; // unless starting anew failed
+    bool hasLanded = isWhole && numbers_ == Numbers::byCount && landAtCheckpoint(number);
+    const int tries = !isWhole || !canLand() || isChained_ ? 0 : attempts;
+    std::uint64_t back = warmUp_;
+    for (int i = 0; i < tries && !hasLanded && number > back; ++i, back = 4 * back + kReach)
+        hasLanded = land(number, back);
+    if (hasLanded) {
+        number = pending_->start;
+        return kStatusOK;
+    }
+    number = 0;
+    return restart();
+}
+
+/// What the demultiplexer has to be asked for. One that looks for blocks finds their place by the bit rate that the
+/// file states, which says little of ADPCM.
+std::int64_t FileDecoder::timeOf(std::uint64_t number) const
+{
+    const auto place = static_cast<std::int64_t>(number);
+    if (numbers_ == Numbers::byTime)
+        return base_ + place;
+    const AVCodecParameters& parameters = *demuxer_.stream().codecpar;
+    const std::int64_t block = parameters.block_align;
+    const std::int64_t byteRate = parameters.bit_rate >= 8 ? parameters.bit_rate / 8 : block * parameters.sample_rate;
+    return av_rescale_rnd(place / static_cast<std::int64_t>(framesPerBlock_) * block, parameters.sample_rate, byteRate,
+                          AV_ROUND_DOWN);
+}
+
+/// Decodes from `back` frames before `number` on; false when frames come too late for what `number` needs.
+bool FileDecoder::land(std::uint64_t number, std::uint64_t back)
+{
+    pending_.reset();
+    if (!demuxer_.seek(timeOf(number - back)))
+        return false;
+    if (corrections_)
+        corrections_->seek(timeOf(number - back));
+    codec_->flush();
+    isNumbered_ = hasGivenUp_ = false;
+    page_ = -1;
+    Span span;
+    if (decodeNext(span) != kStatusOK || span.start == kNever || span.start > number - warmUp_)
+        return false;
+    pending_ = span;
+    return true;
+}
+
+/// The same by two checkpoints: where the first is met the decoder begins to know what it must, at the second numbers
+/// begin.
+bool FileDecoder::landAtCheckpoint(std::uint64_t number)
+{
+    const std::size_t before = checkpoints_.countUpTo(number);
+    if (before < 2)
+        return false;
+    pending_.reset();
+    if (!demuxer_.seek(checkpoints_[before - 2].time))
+        return false;
+    codec_->flush();
+    isNumbered_ = hasGivenUp_ = false;
+    met_ = 0;
+    searchEnd_ = checkpoints_[before - 1].time;
+    Span span;
+    const bool isFound = decodeNext(span) == kStatusOK && span.start <= number;
+    if (isFound)
+        pending_ = span;
+    return isFound;
+}
+
+// Decoding.
+
+std::int32_t FileDecoder::next(Span& span)
+{
+    if (pending_) {
+        span = *std::exchange(pending_, std::nullopt);
+        return kStatusOK;
+    }
+    return decodeNext(span);
+}
+
+/// Ogg states one time a page, and FFmpeg reckons the others from what it takes packets to last; of Vorbis it is wrong
+/// where long blocks become short ones. So there a frame tells only when it has the length that it was given.
+bool FileDecoder::tellsNumber(const AVFrame& frame) const
+{
+    if (numbers_ == Numbers::byCount || frame.pts == AV_NOPTS_VALUE)
+        return false;
+    return !isPaged_ || frame.pkt_duration == frame.nb_samples;
+}
+
+std::int32_t FileDecoder::decodeNext(Span& span)
+{
+    for (;;) {
+        switch (codec_->receive()) {
+        case Codec::Result::frame: {
+            const AVFrame& frame = decoded();
+            const bool isTold = tellsNumber(frame);
+            if (isTold && numbers_ == Numbers::byTime && base_ == AV_NOPTS_VALUE)
+                base_ = startOf(frame);
+            const std::int64_t origin = numbers_ == Numbers::byTime ? base_ : 0;
+            const std::uint64_t told = static_cast<std::uint64_t>(frame.pts) - static_cast<std::uint64_t>(origin);
+            if (isTold && (frame.pts < origin || told >= std::min(limit_, kMostFrames)))
+                break;
+            isNumbered_ = isNumbered_ || isTold;
+            if (!isNumbered_ || frame.nb_samples <= 0)
+                break;
+            span.start = isTold ? told : expected_;
+            length_ = static_cast<std::uint64_t>(frame.nb_samples);
+            span.end = expected_ = span.start + length_;
+            return kStatusOK;
+        }
+        case Codec::Result::needsPacket:
+            if (const std::int32_t status = sendPacket(); status != kStatusOK)
+                return status;
+            if (!hasGivenUp_)
+                break;
+            [[fallthrough]];
+        case Codec::Result::end:
+            span = {kNever, kNever};
+            return kStatusOK;
+        case Codec::Result::failed:
+            passOver();
+            break;
+        }
+    }
+}
+
+/// A packet has failed: where frames are counted, as many as the last one gave are missing.
+void FileDecoder::passOver()
+{
+    if (numbers_ == Numbers::byCount && isNumbered_ && expected_ > 0)
+        expected_ += length_;
+}
+
+std::int32_t FileDecoder::sendPacket()
+{
+    std::int32_t status = kStatusOK;
+    if (!demuxer_.read(*packet_, status))
+        return status != kStatusOK || codec_->send(nullptr) != Codec::Sent::outOfMemory ? status : kStatusOutOfMemory;
+    if (corrections_)
+        corrections_->attachTo(*packet_);
+    numberPacket();
+    const Codec::Sent sent = codec_->send(packet_.get());
+    if (sent == Codec::Sent::failed)
+        passOver();
+    av_packet_unref(packet_.get());
+    return sent != Codec::Sent::outOfMemory ? kStatusOK : kStatusOutOfMemory;
+}
+
+/// What the packet at hand tells of the numbers of its frames.
+void FileDecoder::numberPacket()
+{
+    AVPacket& packet = *packet_;
+    switch (numbers_) {
+    case Numbers::byTime:
+        // In Ogg, times on the page that a seek leads to are reckoned from its end, which the last page may have cut
+        // short; from the next page on they follow from the one before.
+        if (isPaged_ && !isNumbered_ && (page_ < 0 || packet.pos == page_)) {
+            page_ = packet.pos;
+            packet.pts = AV_NOPTS_VALUE;
+        }
+        break;
+    case Numbers::byPosition: {
+        if (base_ == AV_NOPTS_VALUE)
+            base_ = packet.pos;
+        const int block = demuxer_.stream().codecpar->block_align;
+        const bool isKnown = packet.pos >= base_ && (packet.pos - base_) % block == 0;
+        packet.pts =
+            isKnown ? (packet.pos - base_) / block * static_cast<std::int64_t>(framesPerBlock_) : AV_NOPTS_VALUE;
+        break;
+    }
+    case Numbers::byCount: {
+        const std::int64_t time = packet.pts;
+        packet.pts = AV_NOPTS_VALUE;
+        if (time == AV_NOPTS_VALUE)
+            break;
+        if (isCounting_)
+            checkpoints_.offer({time, packet.pos, expected_});
+        const Checkpoint* met = isNumbered_ ? nullptr : checkpoints_.find(time, packet.pos);
+        if (met != nullptr && ++met_ == 2) {
+            expected_ = met->frame;
+            isNumbered_ = true;
+        }
+        hasGivenUp_ = !isNumbered_ && time > searchEnd_;
+        break;
+    }
+    }
+}
+
+std::unique_ptr<AudioDecoder> openFile(const char* path, std::int32_t& status)
+{
+    return FileDecoder::open(path, status);
+}
+
+} // namespace platform::ffmpeg

@@ -1,0 +1,77 @@
+// Decoding of files in which only FFmpeg finds its way: FLAC, Ogg, WMA and whatever else it knows.
+#pragma once
+
+#include "media/ffmpeg/Checkpoints.h"
+#include "media/ffmpeg/Codec.h"
+#include "media/ffmpeg/CorrectionFile.h"
+#include "media/ffmpeg/Demuxer.h"
+#include "media/ffmpeg/SpanDecoder.h"
+
+#include <memory>
+#include <optional>
+
+namespace platform::ffmpeg {
+
+class FileDecoder final : public SpanDecoder {
+public:
+    static std::unique_ptr<FileDecoder> open(const char* path, std::int32_t& status);
+
+private:
+    /// Where the numbers of frames come from.
+    enum class Numbers {
+        byTime,     // times count frames; those of a run follow one from another, but for gaps
+        byPosition, // all packets are blocks of one size, one behind the other
+        byCount,    // what was decoded from the start on
+    };
+
+    FileDecoder(Demuxer demuxer, std::unique_ptr<CorrectionFile> corrections);
+    std::int32_t begin();
+    std::int32_t describeAsDecoded();
+    std::int32_t countFrames(std::uint64_t& count);
+    std::int32_t countFromStart(std::uint64_t& count);
+    std::int32_t decodeRest(std::uint64_t& end);
+    std::int64_t startOf(const AVFrame& frame) const;
+    std::int32_t restart();
+    bool canLand() const;
+    std::int64_t timeOf(std::uint64_t number) const;
+    bool land(std::uint64_t number, std::uint64_t back);
+    bool landAtCheckpoint(std::uint64_t number);
+    std::int32_t decodeNext(Span& span);
+    bool tellsNumber(const AVFrame& frame) const;
+    std::int32_t sendPacket();
+    void numberPacket();
+    void passOver();
+
+    std::int32_t next(Span& span) override;
+    std::int32_t startAt(std::uint64_t& number) override;
+    std::uint64_t reach(std::uint64_t number) override;
+    const AVFrame& decoded() const override { return codec_->frame(); }
+
+    Demuxer demuxer_;
+    std::unique_ptr<CorrectionFile> corrections_; // null when there are none
+    std::unique_ptr<Codec> codec_;
+    Packet packet_;
+    Numbers numbers_ = Numbers::byCount;
+    std::int64_t base_ = 0;            // the time, or the position, of number 0
+    std::uint64_t framesPerBlock_ = 0; // of blocks of one size
+    bool isPaged_ = false;             // by Ogg
+    bool endsWithTime_ = false;        // the file states where the sound ends, and the last packet may go beyond
+    std::int64_t page_ = -1;           // the one that the last seek led to; negative before it is known
+    bool isChained_ = false;           // nothing decodes but from the start
+    std::uint64_t warmUp_ = 0;         // frames to decode and drop ahead of one
+    std::uint64_t limit_ = kNever;     // no frame lies there or behind
+    std::uint64_t expected_ = 0;       // the number of the next frame where nothing else tells it
+    std::uint64_t length_ = 0;         // of the last span
+    bool isNumbered_ = true;           // `expected_` holds; else frames are dropped
+    std::optional<Span> pending_;      // decoded, and to be handed out next
+    Checkpoints checkpoints_;
+    bool isCounting_ = false;
+    std::size_t met_ = 0;        // checkpoints since the last seek
+    std::int64_t searchEnd_ = 0; // the time by which two must have been met
+    bool hasGivenUp_ = false;    // they were not
+};
+
+/// As DecoderModule::openFile.
+std::unique_ptr<AudioDecoder> openFile(const char* path, std::int32_t& status);
+
+} // namespace platform::ffmpeg

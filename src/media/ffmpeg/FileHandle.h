@@ -1,0 +1,26 @@
+// What callers get to see of a file that a decoder owns: its properties.
+#pragma once
+
+#include "media/userdata/AudioFileService.h"
+
+#include <cstdint>
+
+namespace platform::ffmpeg {
+
+/// Answers with the type, the format and the number of packets, where that is known; takes no property.
+class FileHandle final : public AudioHandle {
+public:
+    static constexpr std::uint64_t unknownCount = ~std::uint64_t{0};
+
+    FileHandle(FourCC type, const StreamDescription& format, std::uint64_t packetCount);
+    std::int32_t propertyInfo(FourCC id, std::uint32_t& size, bool& isWritable) override;
+    std::int32_t property(FourCC id, std::uint32_t& size, void* data) override;
+    std::int32_t setProperty(FourCC id, std::uint32_t size, const void* data) override;
+
+private:
+    FourCC type_;
+    StreamDescription format_;
+    std::uint64_t packetCount_;
+};
+
+} // namespace platform::ffmpeg

@@ -1,0 +1,44 @@
+// Decoding of packets that the library found itself.
+#pragma once
+
+#include "media/ffmpeg/Codec.h"
+#include "media/ffmpeg/SpanDecoder.h"
+#include "media/packets/PacketSource.h"
+
+#include <memory>
+
+namespace platform::ffmpeg {
+
+/// The frames of packet p are the numbers from p x framesPerPacket on, whatever the decoder makes of it: a packet that
+/// does not decode is silence, one of other frames is cut or filled up.
+class PacketDecoder final : public SpanDecoder {
+public:
+    static std::unique_ptr<PacketDecoder> open(std::unique_ptr<PacketSource> source, std::int32_t& status);
+
+    bool packetTable(PacketTable& table) const override;
+
+private:
+    PacketDecoder(std::unique_ptr<PacketSource> source, CodecParameters parameters, std::unique_ptr<Codec> codec);
+    std::int32_t describeAsDecoded();
+    std::int32_t next(Span& span) override;
+    std::int32_t startAt(std::uint64_t& number) override;
+    std::uint64_t reach(std::uint64_t number) override;
+    const AVFrame& decoded() const override { return codec_->frame(); }
+    std::int32_t sendPacket();
+    std::uint64_t packetOf(std::uint64_t number) const;
+
+    std::unique_ptr<PacketSource> source_;
+    CodecParameters parameters_;
+    std::unique_ptr<Codec> codec_;
+    Packet packet_;
+    Bytes bytes_;
+    PacketTable table_;
+    std::uint64_t framesPerPacket_ = 0;
+    std::uint64_t sent_ = 0;    // packets before this one went to the decoder, or were passed over
+    std::uint64_t awaited_ = 0; // no frame of this packet, or of a later one, came out yet
+};
+
+/// As DecoderModule::openPackets.
+std::unique_ptr<AudioDecoder> openPackets(std::unique_ptr<PacketSource> source, std::int32_t& status);
+
+} // namespace platform::ffmpeg

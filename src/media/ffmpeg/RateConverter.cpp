@@ -1,0 +1,130 @@
+#include "media/ffmpeg/RateConverter.h"
+
+#include "media/containers/AudioHandle.h"
+#include "platform/core/Status.h"
+
+extern "C" {
+#include <libavutil/channel_layout.h>
+#include <libavutil/opt.h>
+#include <libswresample/swresample.h>
+}
+
+#include <algorithm>
+#include <bit>
+#include <cmath>
+#include <numeric>
+#include <utility>
+
+namespace platform::ffmpeg {
+
+namespace {
+
+// The filter: a windowed sinc of 128 crossings (at the lower of the two rates) under a Kaiser window. From 48 to 44.1
+// kHz, measured: 19.5 kHz pass within 0.0001 dB, 22.5 kHz are 119 dB down, and the noise of a sine is at -134 dB.
+constexpr int kCrossings = 128;
+constexpr double kKaiserBeta = 12;
+constexpr double kCutoff = 0.95;
+
+// A filter for each phase of the ratio makes every output frame exact. Where that were more than this many
+// coefficients, there are 1,024 phases, and each frame is the line between two of them, at its exact time.
+constexpr std::uint64_t kMaxExactCoefficients = 1 << 20;
+constexpr std::uint32_t kInterpolatedPhases = 1024;
+constexpr std::uint64_t kMaxCoefficients = 1 << 24; // of 32 bits
+
+/// How the library is to build its filter.
+struct Filter {
+    std::uint64_t taps;
+    std::uint32_t phases;
+    bool isExact;
+
+    Filter(std::uint32_t fromRate, std::uint32_t toRate)
+    {
+        const double factor = std::min(toRate * kCutoff / fromRate, 1.0);
+        taps = static_cast<std::uint64_t>(std::ceil(kCrossings / factor)) + 1; // an even number of them
+        const std::uint32_t exactPhases = toRate / std::gcd(fromRate, toRate);
+        isExact = exactPhases <= kInterpolatedPhases || exactPhases * taps <= kMaxExactCoefficients;
+        phases = isExact ? exactPhases : kInterpolatedPhases;
+    }
+    bool isReasonable() const { return phases * taps <= kMaxCoefficients; }
+    int phaseShift() const { return static_cast<int>(std::bit_width(std::max(phases, kInterpolatedPhases) - 1)); }
+};
+
+struct SwrDeleter {
+    void operator()(SwrContext* context) const { swr_free(&context); }
+};
+using SwrOwner = std::unique_ptr<SwrContext, SwrDeleter>;
+
+std::int32_t statusOf(int error)
+{
+    return error >= 0 ? kStatusOK : error == AVERROR(ENOMEM) ? kStatusOutOfMemory : kStatusIOError;
+}
+
+class RateConverter final : public Resampler {
+public:
+    RateConverter(SwrOwner context, const Filter& filter)
+        : context_(std::move(context)),
+          reach_(static_cast<std::uint32_t>(filter.taps / 2 + 8)) // taps come in eights
+    {
+    }
+    std::uint32_t reach() const override { return reach_; }
+    std::int32_t reset() override { return statusOf(swr_init(context_.get())); } // the filter stays
+    std::int32_t convert(const float* from, std::uint32_t taken, float* to, std::uint32_t& made) override
+    {
+        static constexpr float nothing = 0; // a null pointer would say that the sound ends
+        const auto* input = reinterpret_cast<const std::uint8_t*>(taken > 0 ? from : &nothing);
+        auto* output = reinterpret_cast<std::uint8_t*>(to);
+        const int done = swr_convert(context_.get(), &output, static_cast<int>(made), &input, static_cast<int>(taken));
+        made = static_cast<std::uint32_t>(std::max(done, 0));
+        return statusOf(done);
+    }
+
+private:
+    SwrOwner context_;
+    std::uint32_t reach_;
+};
+
+int setOptions(SwrContext* context, const Filter& filter)
+{
+    int error = 0;
+    const auto set = [&](const char* name, std::int64_t value) {
+        if (error >= 0)
+            error = av_opt_set_int(context, name, value, 0);
+    };
+    set("filter_size", kCrossings);
+    set("phase_shift", filter.phaseShift());
+    set("exact_rational", 1);
+    set("linear_interp", filter.isExact ? 0 : 1);
+    set("filter_type", SWR_FILTER_TYPE_KAISER);
+    if (error >= 0)
+        error = av_opt_set_double(context, "kaiser_beta", kKaiserBeta, 0);
+    return error >= 0 ? av_opt_set_double(context, "cutoff", kCutoff, 0) : error;
+}
+
+} // namespace
+
+std::unique_ptr<Resampler> makeRateConverter(std::uint32_t channels, std::uint32_t fromRate, std::uint32_t toRate,
+                                             std::int32_t& status)
+{
+    const auto isRate = [](std::uint32_t rate) { return rate >= 1 && rate <= Resampler::kMaxRate; };
+    status = AudioHandle::kFormatNotSupported;
+    if (channels < 1 || channels > Resampler::kMaxChannels || !isRate(fromRate) || !isRate(toRate) ||
+        fromRate == toRate)
+        return nullptr;
+    const Filter filter(fromRate, toRate);
+    if (!filter.isReasonable())
+        return nullptr;
+    AVChannelLayout layout = {};
+    layout.nb_channels = static_cast<int>(channels);
+    SwrContext* made = nullptr;
+    int error = swr_alloc_set_opts2(&made, &layout, AV_SAMPLE_FMT_FLT, static_cast<int>(toRate), &layout,
+                                    AV_SAMPLE_FMT_FLT, static_cast<int>(fromRate), 0, nullptr);
+    SwrOwner context(made);
+    if (error >= 0)
+        error = setOptions(context.get(), filter);
+    if (error >= 0)
+        error = swr_init(context.get());
+    status = statusOf(error);
+    return error >= 0 ? std::make_unique<RateConverter>(std::move(context), filter) : nullptr;
+}
+
+} // namespace platform::ffmpeg

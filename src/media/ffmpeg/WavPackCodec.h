@@ -1,0 +1,38 @@
+// Decoding by libwavpack.
+#pragma once
+
+#include "media/ffmpeg/Codec.h"
+
+#include <cstdint>
+
+namespace platform::ffmpeg {
+
+/// Each packet is decoded by itself: the blocks of a stretch of time with their headers, as FFmpeg gives them of
+/// WavPack and Matroska files. One that is not what its checksums say has failed. DSD, of which a block needs the one
+/// ahead of it, is left to libavcodec.
+class WavPackCodec final : public Codec {
+public:
+    /// As Codec::open.
+    static std::unique_ptr<Codec> open(const AVCodecParameters& parameters, int numerator, int denominator,
+                                       Padding padding, std::int32_t& status);
+
+    const AVFrame& frame() const override;
+    int sourceBits() const override;
+    Result receive() override;
+    Sent send(const AVPacket* packet) override;
+    void flush() override;
+
+private:
+    explicit WavPackCodec(std::unique_ptr<Codec> ofDSD);
+    bool takeHeader();
+    bool decode();
+
+    std::unique_ptr<Codec> ofDSD_;
+    bool isDSD_ = false;
+    Packet packet_; // that is to be decoded; empty when there is none
+    Frame frame_;
+    bool isEnd_ = false;
+    int sourceBits_ = 0;
+};
+
+} // namespace platform::ffmpeg

@@ -1,0 +1,42 @@
+// The packets of an MP3 file: MPEG-1, MPEG-2 and MPEG-2.5 audio, layer III.
+#pragma once
+
+#include "media/packets/FrameIndex.h"
+#include "media/packets/MP3Info.h"
+#include "media/packets/MPEGFrameHeader.h"
+#include "media/packets/PacketSource.h"
+
+namespace platform {
+
+/// The first frame of sound decides on version, sample rate and channels; frames of another kind are passed over like
+/// any other bytes that are none. A packet is a whole frame, its header included.
+class MP3Packets final : public PacketSource {
+public:
+    /// Null, with `status` kFormatNotSupported when the file is no MP3. `file` is taken over when it is.
+    static std::unique_ptr<PacketSource> open(std::unique_ptr<PacketFile>& file, std::int32_t& status);
+
+    const StreamDescription& format() const override { return format_; }
+    FourCC fileType() const override { return fourCC("MPG3"); }
+    BytesView cookie() const override { return {}; }
+    const PacketTable& table() const override { return table_; }
+    std::uint64_t packetCount() const override { return packetCount_; }
+    std::uint64_t preRoll(std::uint64_t packet) override;
+    std::int32_t read(std::uint64_t packet, Bytes& bytes) override;
+
+private:
+    struct Start; // of the frames, and what the first says
+    static Start findStart(PacketFile& file);
+    static MPEGFrameHeader firstOfSound(PacketFile& file, const Start& start);
+    MP3Packets(std::unique_ptr<PacketFile> file, const Start& start, std::uint64_t end);
+    std::int32_t countPackets(const Start& start, std::uint64_t end);
+    void makeTable(const MP3Info& info);
+
+    std::unique_ptr<PacketFile> file_;
+    MPEGFrameHeader first_;
+    FrameIndex index_;
+    StreamDescription format_;
+    PacketTable table_;
+    std::uint64_t packetCount_ = 0;
+};
+
+} // namespace platform

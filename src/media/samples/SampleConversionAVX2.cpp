@@ -1,0 +1,216 @@
+#include "media/samples/SampleConversionAVX2.h"
+
+#if defined(__x86_64__)
+
+#include "media/samples/SampleLanesAVX2.h"
+
+namespace platform {
+namespace {
+
+using namespace avx2;
+constexpr std::size_t kStep = 8; // samples in a vector of floats
+
+KT_AVX2 inline void store16(Byte* to, __m128i value)
+{
+    _mm_storeu_si128(reinterpret_cast<__m128i*>(to), value);
+}
+
+// Eight samples, left-aligned or not: `kScale` brings them to [-1, 1).
+template <int Bytes, bool Big, bool Unsigned = false>
+struct Integers {
+    static constexpr std::size_t size = Bytes;
+    // 24 bits stand in the upper bytes of their lanes, where converting them is exact.
+    static constexpr int laneBits = Bytes == 3 ? 32 : 8 * Bytes;
+    static constexpr float scale = 1.0F / static_cast<float>(std::uint32_t{1} << (laneBits - 1));
+
+    KT_AVX2 static inline __m256i lanes(const Byte* from)
+    {
+        if constexpr (Bytes == 1) {
+            const __m128i bytes = _mm_loadl_epi64(reinterpret_cast<const __m128i*>(from));
+            return _mm256_cvtepi8_epi32(Unsigned ? _mm_xor_si128(bytes, _mm_set1_epi8(-128)) : bytes);
+        } else if constexpr (Bytes == 2) {
+            const __m128i words = load16(from);
+            return _mm256_cvtepi16_epi32(Big ? swap2(words) : words);
+        } else if constexpr (Bytes == 3) {
+            return load24<Big>(from);
+        } else {
+            const __m256i words = _mm256_loadu_si256(reinterpret_cast<const __m256i*>(from));
+            return Big ? swap4(words) : words;
+        }
+    }
+
+    KT_AVX2 static inline void read(const Byte* from, float* to)
+    {
+        _mm256_storeu_ps(to, _mm256_mul_ps(_mm256_cvtepi32_ps(lanes(from)), _mm256_set1_ps(scale)));
+    }
+
+    // Rounds half to even, clamps, makes NaN 0: eight integers.
+    KT_AVX2 static inline __m256i rounded(const float* from)
+    {
+        constexpr float full = static_cast<float>(std::uint32_t{1} << (8 * Bytes - 1));
+        const __m256 samples = _mm256_mul_ps(_mm256_loadu_ps(from), _mm256_set1_ps(full));
+        const __m256 numbers = _mm256_and_ps(samples, _mm256_cmp_ps(samples, samples, _CMP_ORD_Q));
+        const __m256 above = _mm256_max_ps(numbers, _mm256_set1_ps(-full));
+        if constexpr (Bytes < 4)
+            return _mm256_cvtps_epi32(_mm256_min_ps(above, _mm256_set1_ps(full - 1)));
+        // The highest of 32 bits is no float: what is too large converts to 0x80000000, whose complement is the
+        // highest.
+        const __m256 tooLarge = _mm256_cmp_ps(above, _mm256_set1_ps(full), _CMP_GE_OQ);
+        return _mm256_xor_si256(_mm256_cvtps_epi32(above), _mm256_castps_si256(tooLarge));
+    }
+
+    KT_AVX2 static inline void write(Byte* to, const float* from)
+    {
+        const __m256i values = rounded(from);
+        if constexpr (Bytes == 4) {
+            _mm256_storeu_si256(reinterpret_cast<__m256i*>(to), Big ? swap4(values) : values);
+        } else if constexpr (Bytes == 3) {
+            const __m128i little = _mm_setr_epi8(0, 1, 2, 4, 5, 6, 8, 9, 10, 12, 13, 14, -1, -1, -1, -1);
+            const __m128i big = _mm_setr_epi8(2, 1, 0, 6, 5, 4, 10, 9, 8, 14, 13, 12, -1, -1, -1, -1);
+            const __m256i packed = _mm256_shuffle_epi8(values, _mm256_broadcastsi128_si256(Big ? big : little));
+            const __m128i second = _mm256_extracti128_si256(packed, 1);
+            store16(to, _mm256_castsi256_si128(packed)); // its last 4 bytes are overwritten
+            _mm_storel_epi64(reinterpret_cast<__m128i*>(to + 12), second);
+            _mm_storeu_si32(to + 20, _mm_srli_si128(second, 8));
+        } else {
+            const __m128i words = _mm_packs_epi32(_mm256_castsi256_si128(values), _mm256_extracti128_si256(values, 1));
+            if constexpr (Bytes == 2) {
+                store16(to, Big ? swap2(words) : words);
+            } else {
+                const __m128i bytes = _mm_packs_epi16(words, words);
+                _mm_storel_epi64(reinterpret_cast<__m128i*>(to),
+                                 Unsigned ? _mm_xor_si128(bytes, _mm_set1_epi8(-128)) : bytes);
+            }
+        }
+    }
+};
+
+template <bool Big>
+struct Floats {
+    static constexpr std::size_t size = 4;
+
+    KT_AVX2 static inline void read(const Byte* from, float* to)
+    {
+        const __m256i words = _mm256_loadu_si256(reinterpret_cast<const __m256i*>(from));
+        _mm256_storeu_si256(reinterpret_cast<__m256i*>(to), Big ? swap4(words) : words);
+    }
+
+    KT_AVX2 static inline void write(Byte* to, const float* from)
+    {
+        const __m256i words = _mm256_loadu_si256(reinterpret_cast<const __m256i*>(from));
+        _mm256_storeu_si256(reinterpret_cast<__m256i*>(to), Big ? swap4(words) : words);
+    }
+};
+
+template <bool Big>
+struct Doubles {
+    static constexpr std::size_t size = 8;
+
+    KT_AVX2 static inline void read(const Byte* from, float* to)
+    {
+        for (std::size_t half = 0; half < 2; ++half) {
+            const __m256i words = _mm256_loadu_si256(reinterpret_cast<const __m256i*>(from + 32 * half));
+            _mm_storeu_ps(to + 4 * half, _mm256_cvtpd_ps(_mm256_castsi256_pd(Big ? swap8(words) : words)));
+        }
+    }
+
+    KT_AVX2 static inline void write(Byte* to, const float* from)
+    {
+        for (std::size_t half = 0; half < 2; ++half) {
+            const __m256i words = _mm256_castpd_si256(_mm256_cvtps_pd(_mm_loadu_ps(from + 4 * half)));
+            _mm256_storeu_si256(reinterpret_cast<__m256i*>(to + 32 * half), Big ? swap8(words) : words);
+        }
+    }
+};
+
+template <class Format>
+struct Reader {
+    KT_AVX2 static std::size_t run(const void* samples, float* to, std::size_t count)
+    {
+        const auto* from = static_cast<const Byte*>(samples);
+        const std::size_t whole = count / kStep * kStep;
+        for (std::size_t i = 0; i < whole; i += kStep)
+            Format::read(from + i * Format::size, to + i);
+        return whole;
+    }
+};
+
+template <class Format>
+struct Writer {
+    KT_AVX2 static std::size_t run(const float* from, void* samples, std::size_t count)
+    {
+        auto* to = static_cast<Byte*>(samples);
+        const std::size_t whole = count / kStep * kStep;
+        for (std::size_t i = 0; i < whole; i += kStep)
+            Format::write(to + i * Format::size, from + i);
+        return whole;
+    }
+};
+
+template <template <class> class Road, bool Big, class From, class To>
+std::size_t dispatch(SampleFormat format, From from, To to, std::size_t count)
+{
+    if (format.isFloat)
+        return format.bits == 64 ? Road<Doubles<Big>>::run(from, to, count) : Road<Floats<Big>>::run(from, to, count);
+    switch (format.bits) {
+    case 8:
+        return format.isUnsigned ? Road<Integers<1, Big, true>>::run(from, to, count)
+                                 : Road<Integers<1, Big>>::run(from, to, count);
+    case 16:
+        return Road<Integers<2, Big>>::run(from, to, count);
+    case 24:
+        return Road<Integers<3, Big>>::run(from, to, count);
+    default:
+        return Road<Integers<4, Big>>::run(from, to, count);
+    }
+}
+
+template <template <class> class Road, class From, class To>
+std::size_t dispatch(SampleFormat format, From from, To to, std::size_t count)
+{
+    return format.order == std::endian::big ? dispatch<Road, true>(format, from, to, count)
+                                            : dispatch<Road, false>(format, from, to, count);
+}
+
+} // namespace
+
+bool hasAVX2()
+{
+    __builtin_cpu_init(); // may run ahead of the constructor that does it
+    return __builtin_cpu_supports("avx2") != 0;
+}
+
+std::size_t samplesToFloatAVX2(const void* samples, SampleFormat format, float* to, std::size_t count)
+{
+    return dispatch<Reader>(format, samples, to, count);
+}
+
+std::size_t floatToSamplesAVX2(const float* from, SampleFormat format, void* samples, std::size_t count)
+{
+    return dispatch<Writer>(format, from, samples, count);
+}
+
+} // namespace platform
+
+#else
+
+namespace platform {
+
+bool hasAVX2()
+{
+    return false;
+}
+
+std::size_t samplesToFloatAVX2(const void*, SampleFormat, float*, std::size_t)
+{
+    return 0;
+}
+
+std::size_t floatToSamplesAVX2(const float*, SampleFormat, void*, std::size_t)
+{
+    return 0;
+}
+
+} // namespace platform
+
+#endif

@@ -89,6 +89,7 @@ void SetStoredFormat(AudioFileInfo& info, const platform::StoredFormat& format)
         info.sampleFormat = {};
         return;
     }
+    info.sourceBits = static_cast<std::int32_t>(format.validBits > 0 ? format.validBits : stream.bitsPerChannel);
     info.floatingPoint = info.sampleFormat.isFloat;
     info.byteSwapped = info.sampleFormat.order != std::endian::native;
     info.bytesPerFrame = static_cast<std::int32_t>(stream.bytesPerFrame);

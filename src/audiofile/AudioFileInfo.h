@@ -59,6 +59,8 @@ struct KT_EXPORT AudioFileInfo {
     std::int64_t dataSize = 0;        // sample bytes that are in the file
     std::int64_t missingDataSize = 0; // sample bytes that the header promises and the file ends ahead of
     TAudioBusFormat busFormat = kAudioBusUndefined;
+    std::int32_t sourceBits = 0; // of a sample those that count: 20 of 24; of lossless codings those of what was coded;
+                                 // else 0
 
     bool IsLinearPCM() const { return !compressed && bytesPerFrame > 0 && sampleFormat.isSupported(); }
     /// 5,000 times the tempo in beats per minute, from beat count, rate and frames; 32 low bits.

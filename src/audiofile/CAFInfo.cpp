@@ -132,6 +132,7 @@ void setCompressedFrames(const platform::URLRef& url, const Chunks& chunks, Audi
     }
     SetSampleRate(info, packets.format.sampleRate);
     info.channels = static_cast<std::int32_t>(packets.format.channelsPerFrame);
+    info.sourceBits = static_cast<std::int32_t>(packets.format.bitsPerChannel);
     info.busFormat = BusFormatOf(chunks.speakers, info.channels);
     info.frames = static_cast<std::int64_t>(packets.frames);
 }

@@ -11,17 +11,18 @@
 namespace {
 
 /// Of `info` the fields that all of these have in common.
-void setCompressed(AudioFileInfo& info, FourCC fileType, FourCC format, double rate, std::uint32_t channels,
+void setCompressed(AudioFileInfo& info, FourCC fileType, const platform::StreamDescription& format,
                    std::uint64_t frames)
 {
     constexpr std::uint64_t most = std::numeric_limits<std::int64_t>::max();
     info.fileType = info.containerId = fileType;
     info.compressed = true;
-    info.formatCode = format;
+    info.formatCode = format.formatId;
     info.bitsPerSample = 0;
-    info.channels = static_cast<std::int32_t>(std::min<std::uint32_t>(channels, 0xFFFF));
+    info.sourceBits = static_cast<std::int32_t>(std::min<std::uint32_t>(format.bitsPerChannel, 64));
+    info.channels = static_cast<std::int32_t>(std::min<std::uint32_t>(format.channelsPerFrame, 0xFFFF));
     info.busFormat = AudioBusFormatForChannels(info.channels);
-    SetSampleRate(info, rate);
+    SetSampleRate(info, format.sampleRate);
     info.frames = static_cast<std::int64_t>(std::min(frames, most));
 }
 
@@ -43,8 +44,10 @@ std::int32_t DescribeFLAC(FileWindow& file, AudioFileInfo& info)
     constexpr std::int64_t offset = 10;
     constexpr std::uint64_t smallestBlock = 10; // bytes
     std::array<std::byte, 16> bytes{};
+    platform::StreamDescription format;
+    format.formatId = fourCC("flac");
     if (file.read(bytes.data(), offset, bytes.size()) != kStatusOK) {
-        setCompressed(info, fourCC("flac"), fourCC("flac"), 0, 0, 0);
+        setCompressed(info, fourCC("flac"), format, 0);
         return kStatusEndOfFile;
     }
     const std::uint32_t mostInBlock = loadBE<std::uint16_t>(bytes.data());
@@ -52,8 +55,10 @@ std::int32_t DescribeFLAC(FileWindow& file, AudioFileInfo& info)
     const auto properties = loadBE<std::uint64_t>(bytes.data() + 8);
     const std::uint64_t capacity = static_cast<std::uint64_t>(info.fileLength) / smallestBlock * mostInBlock;
     const std::uint64_t stated = properties & 0xFFFFFFFFF;
-    setCompressed(info, fourCC("flac"), fourCC("flac"), static_cast<double>(properties >> 44),
-                  static_cast<std::uint32_t>(properties >> 41 & 7) + 1, std::min(stated, capacity));
+    format.sampleRate = static_cast<double>(properties >> 44);
+    format.channelsPerFrame = static_cast<std::uint32_t>(properties >> 41 & 7) + 1;
+    format.bitsPerChannel = static_cast<std::uint32_t>(properties >> 36 & 31) + 1;
+    setCompressed(info, fourCC("flac"), format, std::min(stated, capacity));
     const std::uint32_t largestFrame = loadBE<std::uint32_t>(bytes.data() + 4) & 0xFFFFFF;
     info.framesAreStated = stated == 0 || !platform::flacEndsAt(lastBytes(file, largestFrame), stated, mostInBlock);
     return kStatusOK;
@@ -63,9 +68,16 @@ std::int32_t DescribeCompressed(const platform::URL& url, BytesView start, Audio
 {
     platform::CompressedAudio audio;
     const std::int32_t status = platform::describeCompressedAudio(url, start, audio);
-    if (audio.fileType != 0)
-        setCompressed(info, HostFileType(audio.fileType), audio.format.formatId, audio.format.sampleRate,
-                      audio.format.channelsPerFrame, audio.frames);
+    if (audio.fileType != 0 && audio.format.isLinearPCM() && audio.dataOffset > 0) {
+        info.fileType = info.containerId = HostFileType(audio.fileType);
+        platform::StoredFormat format;
+        format.stream = audio.format;
+        format.coding = audio.format.formatId;
+        SetStoredFormat(info, format);
+        SetSampleData(info, static_cast<std::int64_t>(audio.dataOffset), audio.byteCount);
+        info.frames = static_cast<std::int64_t>(audio.frames);
+    } else if (audio.fileType != 0)
+        setCompressed(info, HostFileType(audio.fileType), audio.format, audio.frames);
     return status;
 }
 

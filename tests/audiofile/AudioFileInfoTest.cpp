@@ -84,6 +84,23 @@ TEST(AudioFileInfo, TakesSampleWidthsAndTagsFromTheWAVEFormat)
     EXPECT_FALSE(withFormat(1, 0, 4, 16).IsLinearPCM());
     EXPECT_FALSE(withFormat(1, 1, 8, 64).IsLinearPCM());
     EXPECT_EQ(withFormat(1, 65535, 0, 65535).frames, 0);
+    EXPECT_EQ(withFormat(1, 2, 6, 20).sourceBits, 20);
+    EXPECT_EQ(withFormat(7, 2, 2, 8).sourceBits, 0);
+    const auto extensible = [](std::uint16_t validBits) {
+        Bytes format = waveFormat(0xFFFE, 2, 96000, 8, 32);
+        ByteWriter rest(std::endian::little);
+        rest.write(std::uint16_t{22});
+        rest.write(validBits);
+        rest.writeZeros(4);
+        rest.write(std::uint16_t{1});
+        rest.write(bytesOf(std::string_view("\0\0\0\0\x10\0\x80\0\0\xAA\0\x38\x9B\x71", 14)));
+        format.insert(format.end(), rest.view().begin(), rest.view().end());
+        return describe(wave(format).chunk("data", 48).bytes());
+    };
+    EXPECT_EQ(extensible(24).sourceBits, 24); // "24 in 32"
+    EXPECT_EQ(extensible(24).bitsPerSample, 32);
+    EXPECT_EQ(extensible(0).sourceBits, 32);
+    EXPECT_EQ(extensible(33).sourceBits, 32);
 }
 
 struct ExtendedFloat {

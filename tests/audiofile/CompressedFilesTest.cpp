@@ -1,4 +1,4 @@
-// Compressed files that are broken, or none at all.
+// Files outside the containers that are edited: compressed ones that are broken, or none at all; linear PCM.
 #include "audiofile/CAudioFileIO.h"
 
 #include "MemoryAudioFile.h"
@@ -25,6 +25,7 @@ TEST(CompressedFiles, BrokenAndForeignOnes)
     writeSound(folder / "a.flac", SF_FORMAT_FLAC | SF_FORMAT_PCM_16, 1, 30011);
     const Bytes flac = readFile(folder / "a.flac");
     EXPECT_EQ(describe(flac, &status).frames, 30011); // in memory, too
+    EXPECT_EQ(describe(flac).sourceBits, 16);
     EXPECT_EQ(status, kStatusOK);
     EXPECT_EQ(describe(BytesView(flac).first(25), &status).frames, 0);
     EXPECT_EQ(status, kStatusEndOfFile);
@@ -43,5 +44,31 @@ TEST(CompressedFiles, BrokenAndForeignOnes)
         EXPECT_EQ(info.frames, 0) << content;
         EXPECT_EQ(file.Open(ref, 0), kStatusOK) << content;
         EXPECT_NE(file.ReadFrames(&frame, 0, 1), kStatusOK) << content;
+    }
+}
+
+TEST(CompressedFiles, LinearPCMInContainersThatAreOnlyRead)
+{
+    const TemporaryFolder folder;
+    const std::string path = folder / "sound";
+    constexpr long frames = 2011;
+    for (const int format : kSoundFormatsToRead) {
+        SCOPED_TRACE(format);
+        writeSound(path, format, 2, frames);
+        const Bytes before = readFile(path);
+        const Sound sound = readSound(path);
+        CAudioFileIO file;
+        ASSERT_EQ(file.OpenReadWrite(CFileRef(path.c_str(), false), 0), kStatusOK);
+        EXPECT_TRUE(file.Info().IsLinearPCM());
+        EXPECT_EQ(file.Info().frames, frames);
+        EXPECT_EQ(file.Info().sampleRate, 44100);
+        std::vector<float> samples(2 * frames);
+        EXPECT_EQ(file.ReadFrames(samples.data(), 0, frames), kStatusOK);
+        EXPECT_EQ(samples, sound.samples);
+        // Nothing makes them longer, and they have no chunks to add to.
+        EXPECT_NE(file.WriteFrames(samples.data(), frames, 10), kStatusOK);
+        EXPECT_EQ(file.AddChunk(fourCC("note"), bytesOf("abcd"), false), 0);
+        EXPECT_EQ(file.Close(), kStatusOK);
+        EXPECT_EQ(readFile(path), before);
     }
 }

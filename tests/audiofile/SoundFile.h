@@ -76,3 +76,12 @@ inline constexpr int kSoundFormats[] = {SF_FORMAT_WAV | SF_FORMAT_PCM_U8,
                                         SF_FORMAT_CAF | SF_FORMAT_DOUBLE,
                                         SF_FORMAT_AIFF | SF_FORMAT_PCM_16 | SF_ENDIAN_LITTLE,
                                         SF_FORMAT_CAF | SF_FORMAT_PCM_24 | SF_ENDIAN_LITTLE};
+/// In containers that are only read: big-endian WAVE, Wave64 and AU.
+inline constexpr int kSoundFormatsToRead[] = {SF_FORMAT_WAV | SF_FORMAT_PCM_16 | SF_ENDIAN_BIG,
+                                              SF_FORMAT_WAV | SF_FORMAT_FLOAT | SF_ENDIAN_BIG,
+                                              SF_FORMAT_W64 | SF_FORMAT_PCM_U8,
+                                              SF_FORMAT_W64 | SF_FORMAT_PCM_24,
+                                              SF_FORMAT_W64 | SF_FORMAT_DOUBLE,
+                                              SF_FORMAT_AU | SF_FORMAT_PCM_S8,
+                                              SF_FORMAT_AU | SF_FORMAT_PCM_24,
+                                              SF_FORMAT_AU | SF_FORMAT_FLOAT};

@@ -24,13 +24,19 @@ Bytes bodyOf(const BodyReader& readBody, const Chunk* chunk, std::size_t least, 
 
 std::optional<StoredFormat> readFormat(const BodyReader& readBody, const ContainerLayout& layout)
 {
-    const FourCC id = layout.kind == ContainerKind::riff  ? fourCC("fmt ")
-                      : layout.kind == ContainerKind::iff ? fourCC("COMM")
-                                                          : fourCC("desc");
-    const Bytes body = bodyOf(readBody, layout.find(id), 0, kMostOfStoredFormat);
-    return layout.kind == ContainerKind::riff  ? storedFormatOfWAVE(body)
-           : layout.kind == ContainerKind::iff ? storedFormatOfAIFF(body, layout.fileType == fourCC("AIFC"))
-                                               : storedFormatOfCAF(body);
+    const auto body = [&](FourCC id) { return bodyOf(readBody, layout.find(id), 0, kMostOfStoredFormat); };
+    switch (layout.kind) {
+    case ContainerKind::riff:
+    case ContainerKind::wave64:
+        return storedFormatOfWAVE(body(fourCC("fmt ")), layout.order());
+    case ContainerKind::iff:
+        return storedFormatOfAIFF(body(fourCC("COMM")), layout.fileType == fourCC("AIFC"));
+    case ContainerKind::caf:
+        return storedFormatOfCAF(body(fourCC("desc")));
+    case ContainerKind::au:
+        return storedFormatOfAU(body(fourCC(".snd")));
+    }
+    return std::nullopt;
 }
 
 /// The packets that a CAF file of packets in differing sizes counts in its packet table.

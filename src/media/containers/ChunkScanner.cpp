@@ -5,6 +5,8 @@
 #include "platform/core/Status.h"
 
 #include <algorithm>
+#include <cstring>
+#include <string_view>
 
 namespace platform {
 
@@ -25,6 +27,16 @@ struct Sizes64 {
     std::size_t tableLength = 0;
 };
 
+/// The last 12 bytes of the identifiers in Wave64: of the file itself, and of all that have a name in RIFF.
+constexpr std::string_view kWave64File("\x2E\x91\xCF\x11\xA5\xD6\x28\xDB\x04\xC1\0\0", 12);
+constexpr std::string_view kWave64Name("\xF3\xAC\xD3\x11\x8C\xD1\0\xC0\x4F\x8E\xDB\x8A", 12);
+
+/// Whether an identifier of 16 bytes is made of a name and these bytes.
+bool isIdentifier(const std::byte* bytes, FourCC name, std::string_view rest)
+{
+    return loadBE<FourCC>(bytes) == name && std::memcmp(bytes + sizeof name, rest.data(), rest.size()) == 0;
+}
+
 class Scan {
 public:
     Scan(HeaderWindow& reader, ContainerLayout& layout) : reader_(reader), layout_(layout) {}
@@ -39,6 +51,14 @@ public:
             layout_.kind = ContainerKind::caf;
             layout_.fileType = id;
             walkCAF();
+        } else if (isWave64(id)) {
+            layout_.kind = ContainerKind::wave64;
+            layout_.fileType = fourCC("W64f");
+            walkWave64();
+        } else if (id == fourCC(".snd")) {
+            layout_.kind = ContainerKind::au;
+            layout_.fileType = fourCC("NeXT");
+            walkAU();
         } else if (!recognize(id)) {
             return reader_.status() != kStatusOK ? reader_.status() : kStatusParameterError;
         } else {
@@ -64,6 +84,11 @@ private:
             return isOne;
         }
         layout_.kind = ContainerKind::riff;
+        if (id == fourCC("RIFX") && layout_.fileType == fourCC("WAVE")) {
+            layout_.isBigEndian = true;
+            layout_.fileType = id;
+            return true;
+        }
         return (id == fourCC("RIFF") || id == fourCC("RF64") || id == fourCC("BW64")) &&
                layout_.fileType == fourCC("WAVE");
     }
@@ -76,7 +101,8 @@ private:
         const auto id = loadBE<FourCC>(first);
         const auto size = loadLE<std::uint32_t>(first + 4);
         layout_.hasReservation = containerId == fourCC("RIFF") && id == fourCC("JUNK") && size >= 28;
-        layout_.hasSizes64 = containerId != fourCC("RIFF") && id == fourCC("ds64") && size >= 28;
+        const bool is64Bit = containerId == fourCC("RF64") || containerId == fourCC("BW64");
+        layout_.hasSizes64 = is64Bit && id == fourCC("ds64") && size >= 28;
         if (!layout_.hasSizes64)
             return;
         sizes64_.riffSize = loadLE<std::uint64_t>(first + 8);
@@ -190,6 +216,68 @@ private:
                 return;
             layout_.end = layout_.nextOf(layout_.chunks.back());
         }
+    }
+
+    bool isWave64(FourCC id)
+    {
+        const std::byte* start = id == fourCC("riff") ? reader_.at(0, 40) : nullptr;
+        return start != nullptr && isIdentifier(start, id, kWave64File) &&
+               isIdentifier(start + 24, fourCC("wave"), kWave64Name);
+    }
+
+    /// Sizes count the header of 24 bytes. A chunk with another identifier than a name in RIFF goes by its first four
+    /// bytes, too.
+    void walkWave64()
+    {
+        constexpr std::uint64_t headerSize = 24, fileHeaderSize = 40;
+        const std::byte* start = reader_.at(0, fileHeaderSize);
+        const std::uint64_t stated = start != nullptr ? loadLE<std::uint64_t>(start + 16) : 0;
+        const bool isOpenFile = stated >= INT64_MAX;
+        layout_.end = fileHeaderSize;
+        while (layout_.end + headerSize <= layout_.fileLength) {
+            const std::byte* header = reader_.at(layout_.end, headerSize);
+            if (header == nullptr) {
+                layout_.isBroken = true;
+                return;
+            }
+            const FourCC id = loadBE<FourCC>(header);
+            const auto extent = loadLE<std::uint64_t>(header + 16);
+            std::uint64_t size = extent - std::min(extent, headerSize);
+            if (meetsSamples(id))
+                size = sizeOfSamples({.body = layout_.end + headerSize,
+                                      .size = static_cast<std::int64_t>(std::min<std::uint64_t>(size, INT64_MAX)),
+                                      .isOpen = extent >= INT64_MAX,
+                                      .containerSize = isOpenFile ? 0 : static_cast<std::int64_t>(stated) - 8});
+            else if (extent < headerSize) {
+                layout_.isBroken = true;
+                return;
+            }
+            if (!append(id, size))
+                return;
+            layout_.end = layout_.nextOf(layout_.chunks.back());
+        }
+    }
+
+    void walkAU()
+    {
+        constexpr std::uint64_t headerSize = 24;
+        const std::byte* start = reader_.at(0, headerSize);
+        if (start == nullptr) {
+            layout_.isBroken = true;
+            return;
+        }
+        const std::uint64_t body = loadBE<std::uint32_t>(start + 4);
+        const auto stated = loadBE<std::uint32_t>(start + 8);
+        append(fourCC(".snd"), headerSize);
+        layout_.end = body;
+        if (body < headerSize || body > layout_.fileLength) {
+            layout_.isBroken = true;
+            return;
+        }
+        layout_.hasSamples = true;
+        append(fourCC("data"),
+               sizeOfSamples({.body = body, .size = std::int64_t{stated}, .isOpen = stated == kSizeIs64Bit}));
+        layout_.end = layout_.nextOf(layout_.chunks.back());
     }
 
     /// Records the chunk at the end; false when there is none, and no more can follow.

@@ -1,5 +1,6 @@
-// The chunks of a container in file order: the service's own scanner, for WAVE (RIFF, RF64, BW64), AIFF, AIFC and CAF.
-// Published sources: EA IFF 85, AIFF 1.3 and AIFC, EBU Tech 3306 (RF64), ITU-R BS.2088 (BW64), CAF 1.0.
+// The chunks of a container in file order: the service's own scanner, for WAVE (RIFF, RF64, BW64), AIFF, AIFC and CAF,
+// and, only to be read, for big-endian WAVE (RIFX), Wave64 and AU. Published sources: EA IFF 85, AIFF 1.3 and AIFC, EBU
+// Tech 3306 (RF64), ITU-R BS.2088 (BW64), CAF 1.0, the Wave64 file format (2003), the manual page audio(4) of AU.
 #pragma once
 
 #include "media/containers/HeaderWindow.h"
@@ -29,6 +30,7 @@ struct ContainerLayout {
     static constexpr FourCC filler = fourCC("free"); // in every container
 
     ContainerKind kind = ContainerKind::riff;
+    bool isBigEndian = false; // RIFX: WAVE whose numbers and samples are
     FourCC fileType = 0;
     std::vector<Chunk> chunks;
     std::uint64_t fileLength = 0;
@@ -38,10 +40,25 @@ struct ContainerLayout {
     bool hasSizes64 = false;     // the first chunk is a "ds64" that counts
     bool hasReservation = false; // the first chunk is a "JUNK" that can become a "ds64"
 
-    std::endian order() const { return kind == ContainerKind::riff ? std::endian::little : std::endian::big; }
-    std::uint64_t headerSize() const { return kind == ContainerKind::caf ? 12 : 8; }
-    /// The pad byte behind a body of this size: RIFF and IFF chunks end at even sizes, CAF chunks have none.
-    std::uint64_t padOf(std::uint64_t size) const { return kind == ContainerKind::caf ? 0 : size & 1; }
+    /// Whether user data can be set and samples written. AU has no chunks: its header (".snd") and its samples ("data")
+    /// stand for two.
+    bool isEditable() const { return kind <= ContainerKind::caf && !isBigEndian; }
+    std::endian order() const
+    {
+        const bool isLittle = (kind == ContainerKind::riff && !isBigEndian) || kind == ContainerKind::wave64;
+        return isLittle ? std::endian::little : std::endian::big;
+    }
+    std::uint64_t headerSize() const
+    {
+        return kind == ContainerKind::caf ? 12 : kind == ContainerKind::wave64 ? 24 : kind == ContainerKind::au ? 0 : 8;
+    }
+    /// The bytes behind a body of this size: RIFF and IFF chunks end at even sizes, those of Wave64 at multiples of 8.
+    std::uint64_t padOf(std::uint64_t size) const
+    {
+        return kind == ContainerKind::wave64                               ? -size & 7
+               : kind == ContainerKind::riff || kind == ContainerKind::iff ? size & 1
+                                                                           : 0;
+    }
     /// Header, body and pad byte.
     std::uint64_t extentOf(std::uint64_t size) const { return headerSize() + size + padOf(size); }
     std::uint64_t bodyOf(const Chunk& chunk) const { return chunk.position + headerSize(); }

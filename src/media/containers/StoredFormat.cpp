@@ -70,7 +70,7 @@ void setLinear(StoredFormat& format, const Linear& linear)
 
 } // namespace
 
-std::optional<StoredFormat> storedFormatOfWAVE(BytesView bytes)
+std::optional<StoredFormat> storedFormatOfWAVE(BytesView bytes, std::endian order)
 {
     constexpr std::size_t plainSize = 16;
     if (bytes.size() < plainSize - 2) // the oldest writers leave out the bits
@@ -78,7 +78,7 @@ std::optional<StoredFormat> storedFormatOfWAVE(BytesView bytes)
     std::array<std::byte, kMostOfStoredFormat> body{};
     const std::size_t there = std::min(bytes.size(), body.size());
     std::copy_n(bytes.begin(), there, body.begin());
-    ByteReader reader(body, std::endian::little);
+    ByteReader reader(body, order);
     StoredFormat format;
     StreamDescription& stream = format.stream;
     auto tag = reader.read<std::uint16_t>();
@@ -90,6 +90,7 @@ std::optional<StoredFormat> storedFormatOfWAVE(BytesView bytes)
     reader.skip(2); // the size of what follows: a chunk as short as that tells as much
     const auto framesPerBlock = reader.read<std::uint16_t>(); // of ADPCM; of extensible formats the valid bits
     if (tag == kTagExtensible && there == body.size()) {
+        format.validBits = framesPerBlock <= stream.bitsPerChannel ? framesPerBlock : 0U;
         format.speakers = reader.read<std::uint32_t>();
         const auto stated = reader.read<std::uint16_t>();
         const BytesView guid = reader.take(kTagGUID.size());
@@ -100,7 +101,10 @@ std::optional<StoredFormat> storedFormatOfWAVE(BytesView bytes)
     if (tag == kTagPCM || tag == kTagFloat) {
         const bool isFloat = tag == kTagFloat;
         const std::uint32_t size = sampleBytes(stream.bitsPerChannel, blockAlign, stream.channelsPerFrame, isFloat);
-        setLinear(format, {.bytesPerSample = size, .isFloat = isFloat, .isUnsigned = size == 1 && !isFloat});
+        setLinear(format, {.bytesPerSample = size,
+                           .isFloat = isFloat,
+                           .isBigEndian = order == std::endian::big,
+                           .isUnsigned = size == 1 && !isFloat});
         return format;
     }
     const bool isADPCM = tag == kTagADPCM || tag == kTagIMAADPCM;
@@ -204,6 +208,40 @@ std::optional<StoredFormat> storedFormatOfCAF(BytesView bytes)
                                sampleBytes(stream.bitsPerChannel, bytesPerFrame, stream.channelsPerFrame, isFloat),
                            .isFloat = isFloat,
                            .isBigEndian = (flags & kLittleEndian) == 0});
+    }
+    return format;
+}
+
+std::optional<StoredFormat> storedFormatOfAU(BytesView bytes)
+{
+    constexpr std::size_t size = 24, encodingOffset = 12;
+    constexpr std::uint32_t muLaw = 1, aLaw = 27;
+    static constexpr std::array<Linear, 6> linearEncodings{
+        {{.bytesPerSample = 1, .isBigEndian = true}, // from 2 on
+         {.bytesPerSample = 2, .isBigEndian = true},
+         {.bytesPerSample = 3, .isBigEndian = true},
+         {.bytesPerSample = 4, .isBigEndian = true},
+         {.bytesPerSample = 4, .isFloat = true, .isBigEndian = true},
+         {.bytesPerSample = 8, .isFloat = true, .isBigEndian = true}}};
+    if (bytes.size() < size)
+        return std::nullopt;
+    ByteReader reader(bytes.subspan(encodingOffset));
+    StoredFormat format;
+    StreamDescription& stream = format.stream;
+    const auto encoding = reader.read<std::uint32_t>();
+    stream.sampleRate = reader.read<std::uint32_t>();
+    stream.channelsPerFrame = reader.read<std::uint32_t>();
+    if (encoding >= 2 && encoding - 2 < linearEncodings.size()) {
+        setLinear(format, linearEncodings[encoding - 2]);
+        return format;
+    }
+    stream.formatId = encoding == muLaw  ? fourCC("ulaw")
+                      : encoding == aLaw ? fourCC("alaw")
+                                         : fourCC('a', 'u', 0, 0) | (encoding & 0xFFFF);
+    format.coding = stream.formatId;
+    if (encoding == muLaw || encoding == aLaw) {
+        stream.bytesPerPacket = stream.channelsPerFrame;
+        stream.framesPerPacket = 1;
     }
     return format;
 }

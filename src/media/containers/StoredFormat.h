@@ -1,18 +1,20 @@
 // What containers say of their samples: "fmt ", "COMM" and "desc", and how long a chunk of samples is whose size was
 // never filled in. Whoever describes a file asks here, so that what one tells of is what the other reads. Published
 // sources: Multimedia Programming Interface and Data Specifications 1.0, RFC 2361 (format tags), AIFF 1.3, the AIFF-C
-// draft of 1991-08-26, and of CAF the published format description, version 1.0.
+// draft of 1991-08-26, of CAF the published format description, version 1.0, and of AU the manual page audio(4).
 #pragma once
 
 #include "media/samples/StreamDescription.h"
 #include "platform/core/Bytes.h"
 
+#include <bit>
 #include <cstdint>
 #include <optional>
 
 namespace platform {
 
-enum class ContainerKind : std::uint8_t { riff, iff, caf };
+/// Wave64 and AU are only read.
+enum class ContainerKind : std::uint8_t { riff, iff, caf, wave64, au };
 
 struct StoredFormat {
     /// Of linear PCM bytesPerFrame is what a frame takes, 0 where that cannot be; samples fill their bytes from the
@@ -23,6 +25,7 @@ struct StoredFormat {
     FourCC coding = 0;
     std::uint64_t countedPackets = 0;      // in AIFF; 0 also where nobody filled it in
     std::optional<std::uint32_t> speakers; // in extensible WAVE: a bit for each
+    std::uint32_t validBits = 0; // in extensible WAVE: of a sample's those that count; 0 where it does not say
 };
 
 /// How many bytes of a format chunk are of use, at most.
@@ -30,9 +33,12 @@ inline constexpr std::size_t kMostOfStoredFormat = 40;
 
 // Each takes the body of the format chunk, as far as it is there; none when it is too short.
 
-std::optional<StoredFormat> storedFormatOfWAVE(BytesView format);
+/// Big-endian in RIFX, samples too.
+std::optional<StoredFormat> storedFormatOfWAVE(BytesView format, std::endian order = std::endian::little);
 std::optional<StoredFormat> storedFormatOfAIFF(BytesView common, bool isAIFC);
 std::optional<StoredFormat> storedFormatOfCAF(BytesView description);
+/// The 24 bytes that an AU file begins with.
+std::optional<StoredFormat> storedFormatOfAU(BytesView header);
 
 /// What is said of how long the chunk of samples is.
 struct SoundChunk {

@@ -10,6 +10,7 @@
 
 #include <algorithm>
 #include <string_view>
+#include <type_traits>
 
 namespace platform {
 
@@ -32,6 +33,7 @@ constexpr Beginning kBeginnings[] = {
     {0, "TTA1", fourCC("tta ")},
     {0, "tBaK", fourCC("tak ")},
     {0, "riff\x2E\x91\xCF\x11", fourCC("W64f")},
+    {0, "RIFX", fourCC("RIFX")},
     {0, "\x1A\x45\xDF\xA3", fourCC("mkv ")},
     {0, "\x0B\x77", fourCC("ac-3")},
     {0, "fLaC", fourCC("flac")},             // behind a tag
@@ -45,9 +47,18 @@ constexpr Beginning kBeginnings[] = {
     {0, "MPCK", fourCC("mpc8")},
     {0, "ajkg", fourCC("shn ")},
     {0, "DSD ", fourCC("dsf ")},
+    {0, "FRM8", fourCC("dff ")},
     {0, "\x7F\xFE\x80\x01", fourCC("dts ")},
+    {0, "\xFE\x7F\x01\x80", fourCC("dts ")}, // words of 16 bits swapped, then words of 14 bits in both orders
+    {0, {"\x1F\xFF\xE8\x00", 4}, fourCC("dts ")},
+    {0, {"\xFF\x1F\x00\xE8", 4}, fourCC("dts ")},
+    {0, "DTSHDHDR", fourCC("dts ")},
+    {4, "\xF8\x72\x6F\xBA", fourCC("mlp ")}, // TrueHD
+    {4, "\xF8\x72\x6F\xBB", fourCC("mlp ")},
+    {0, "\x56\xE0", fourCC("loas"), "\xFF\xE0"},
     {0, "FLV\x01", fourCC("flv ")},
     {0, ".RMF", fourCC("rm  ")},
+    {8, "WAVE", fourCC("WAVE")}, // behind a tag
     {8, "AVI ", fourCC("AVI ")},
     {8, "XWMA", fourCC("xwma")},
     {8, "8SVX", fourCC("iff ")},
@@ -91,18 +102,22 @@ Bytes startBehindTags(const URL& url, BytesView start)
     return {bytes.begin(), bytes.end()};
 }
 
-/// As the module names it, where it does.
-FourCC fileTypeOf(ConvertingReader& reader, FourCC fileType)
+/// What the open file says of itself, where it does: its type as the decoder names it, and where linear PCM stands.
+void setFromFile(ConvertingReader& reader, CompressedAudio& audio)
 {
     AudioHandle* file = nullptr;
     std::uint32_t size = sizeof file;
-    if (reader.property(ConvertingReader::audioFileProperty, size, &file) == kStatusOK && file != nullptr) {
-        size = sizeof fileType;
-        FourCC found = 0;
-        if (file->property(AudioFile::fileTypeProperty, size, &found) == kStatusOK && found != 0)
-            return found;
-    }
-    return fileType;
+    if (reader.property(ConvertingReader::audioFileProperty, size, &file) != kStatusOK || file == nullptr)
+        return;
+    const auto read = [&](FourCC id, auto& value) {
+        std::uint32_t valueSize = sizeof value;
+        std::remove_reference_t<decltype(value)> found = 0;
+        if (file->property(id, valueSize, &found) == kStatusOK && found != 0)
+            value = found;
+    };
+    read(AudioFile::fileTypeProperty, audio.fileType);
+    read(AudioFile::dataOffsetProperty, audio.dataOffset);
+    read(AudioFile::byteCountProperty, audio.byteCount);
 }
 
 } // namespace
@@ -129,7 +144,7 @@ std::int32_t describeCompressedAudio(const URL& url, BytesView start, Compressed
         return kStatusParameterError;
     const auto reader = ConvertingReader::open(url, &status);
     if (reader) {
-        audio.fileType = fileTypeOf(*reader, audio.fileType);
+        setFromFile(*reader, audio);
         audio.format = reader->fileFormat();
         audio.format.sampleRate = reader->clientFormat().sampleRate;
         audio.format.channelsPerFrame = reader->clientFormat().channelsPerFrame;

@@ -42,7 +42,7 @@ namespace {
 /// that others may be asked.
 std::unique_ptr<AudioDecoder> openLinearPCM(const URL& url, std::int32_t& status)
 {
-    auto file = AudioFile::open(url, AudioFile::Permission::read, 0, &status);
+    auto file = AudioFile::openToRead(url, &status);
     if (!file) {
         FileStatus found;
         const bool isOther = status == kStatusParameterError && !url.posixPath().empty() &&

@@ -1,6 +1,6 @@
 // The converting reader: the frames of an audio file in the format that its caller wants. Linear PCM in WAVE, RF64,
-// BW64, AIFF, AIFC and CAF is read by the library itself, everything else by a module that is loaded when the first
-// such file is met (media/decoding/DecoderModule.h).
+// BW64, RIFX, Wave64, AIFF, AIFC, CAF and AU is read by the library itself, everything else by a module that is loaded
+// when the first such file is met (media/decoding/DecoderModule.h).
 #pragma once
 
 #include "media/containers/AudioHandle.h"

@@ -57,6 +57,22 @@ std::unique_ptr<AudioFile> AudioFile::open(const URL& url, Permission permission
 {
     std::int32_t ignored;
     std::int32_t& result = status != nullptr ? *status : ignored;
+    auto file = openAny(url, permission, result);
+    if (file && !file->implementation_->layout.isEditable()) {
+        result = kStatusParameterError;
+        return nullptr;
+    }
+    return file;
+}
+
+std::unique_ptr<AudioFile> AudioFile::openToRead(const URL& url, std::int32_t* status)
+{
+    std::int32_t ignored;
+    return openAny(url, Permission::read, status != nullptr ? *status : ignored);
+}
+
+std::unique_ptr<AudioFile> AudioFile::openAny(const URL& url, Permission permission, std::int32_t& result)
+{
     const std::string path = pathOf(url);
     if (path.empty()) {
         result = kStatusParameterError;

@@ -40,6 +40,9 @@ public:
     /// in the containers known today.
     static std::unique_ptr<AudioFile> open(const URL& url, Permission permission, FourCC typeHint,
                                            std::int32_t* status);
+    /// Opens for reading what open() takes, and the containers that are only read: big-endian WAVE (RIFX), Wave64 and
+    /// AU. kStatusParameterError for others.
+    static std::unique_ptr<AudioFile> openToRead(const URL& url, std::int32_t* status);
     /// Creates a file without samples, open for reading and writing. `fileType` is "WAVE", "AIFF", "AIFC" or "caff";
     /// the format is linear PCM that the container can hold: little-endian in WAVE (8 bits unsigned), big-endian in
     /// AIFF, without floats there. Else kStatusParameterError; kStatusDuplicateName when the file exists, unless
@@ -52,7 +55,7 @@ public:
     std::int32_t property(FourCC id, std::uint32_t& size, void* data) override;
     std::int32_t setProperty(FourCC id, std::uint32_t size, const void* data) override;
 
-    /// "WAVE" (RF64 and BW64 too), "AIFF", "AIFC" or "caff".
+    /// "WAVE" (RF64 and BW64 too), "AIFF", "AIFC" or "caff"; "RIFX", "W64f" or "NeXT" (AU) of what openToRead() adds.
     FourCC fileType() const;
 
     // The audio data. kStatusIOError when the file does not say, or contradicts itself.
@@ -93,6 +96,7 @@ public:
 
 private:
     struct Implementation;
+    static std::unique_ptr<AudioFile> openAny(const URL& url, Permission permission, std::int32_t& status);
     explicit AudioFile(std::unique_ptr<Implementation> implementation);
     std::unique_ptr<Implementation> implementation_;
 };

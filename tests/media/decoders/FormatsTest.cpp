@@ -187,7 +187,7 @@ TEST_P(Formats, DescribesItself)
     size = sizeof again;
     EXPECT_EQ(handle->property(AudioFile::dataFormatProperty, size, &again), 0);
     EXPECT_EQ(again, file);
-    EXPECT_EQ(handle->property(AudioFile::byteCountProperty, size, &again), AudioFile::kUnsupportedProperty);
+    EXPECT_EQ(handle->property(fourCC("none"), size, &again), AudioFile::kUnsupportedProperty);
 }
 
 TEST_P(Formats, HasTheFramesThatWentIn)

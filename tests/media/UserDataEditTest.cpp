@@ -402,6 +402,20 @@ TEST(UserDataEdit, ASecondDataChunkHasASizeOfItsOwn)
 }
 
 // An id of zeros with a size beyond the end: put right, it would be all zeros, and nothing behind it would be found.
+TEST(UserDataEdit, NothingIsPutBehindCAFSamplesThatAreNotThere)
+{
+    const FourCC caf = fourCC("caff");
+    TemporaryFolder folder;
+    const Bytes whole = buildContainer(caf, {formatChunk(caf), {fourCC("data"), ""}});
+    for (const char last : {'\0', '\x75'}) { // of its size: never filled in, and cut short
+        Bytes bytes = whole;
+        bytes.back() = static_cast<std::byte>(last);
+        const std::string path = folder.write("file", bytes);
+        EXPECT_EQ(setItem(*openAudio(path), kItem, 0, "item"), kStatusIOError);
+        EXPECT_EQ(readFile(path), bytes);
+    }
+}
+
 TEST(UserDataEdit, NothingIsPutBehindAHeaderOfZerosThatEndsTheFile)
 {
     for (const FourCC container : {fourCC("WAVE"), fourCC("AIFF"), fourCC("caff")}) {

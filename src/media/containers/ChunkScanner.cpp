@@ -210,6 +210,10 @@ private:
                 layout_.isBroken = true;
                 return;
             }
+            // Samples of which none is there would have a size of 0 if anything followed them, which makes them
+            // unfinished: what followed would be taken for sound.
+            if (isSound && layout_.end + 12 == layout_.fileLength)
+                layout_.isBroken = true;
             const std::uint64_t size = isSound ? sizeOfSamples({.body = layout_.end + 12, .size = stated})
                                                : static_cast<std::uint64_t>(stated);
             if (!append(id, size))

@@ -2,6 +2,7 @@
 import json
 import os
 import re
+import struct
 import subprocess
 import unittest
 
@@ -30,10 +31,10 @@ class Info(CommandTest):
 
     @needs_decoders
     def test_compressed_files(self):
-        for name, row in (("a.mp3", ["MP3", "1.000000", "44100", "mp3", "2"]),
-                          ("a.m4a", ["M4A", "1.000000", "44100", "aac", "2"]),
-                          ("a.flac", ["FLAC", "1.000000", "44100", "flac", "2"]),
-                          ("a.ogg", ["Ogg", "1.000000", "44100", "flac", "2"])):
+        for name, row in (("a.mp3", ["MP3", "1.000000", "44100", "MP3", "2"]),
+                          ("a.m4a", ["M4A", "1.000000", "44100", "AAC", "2"]),
+                          ("a.flac", ["FLAC", "1.000000", "44100", "FLAC 16-bit", "2"]),
+                          ("a.ogg", ["Ogg", "1.000000", "44100", "FLAC 16-bit", "2"])):
             with self.subTest(name):
                 path = self.encoded(name, *(("-c:a", "flac") if name == "a.ogg" else ()))
                 self.assertEqual(self.lines("info", path), ["\t".join([str(path), *row])])
@@ -45,6 +46,26 @@ class Info(CommandTest):
         for name in ("a.mp3", "a.m4a", "a.flac"):
             self.assertEqual(self.lines("info", name, env=plain), self.lines("info", name))
         self.assertIn("install libktfiles-ffmpeg", self.failure("info", "a.ogg", env=plain))
+
+    def test_what_counts_and_what_is_missing(self):
+        def extensible(valid):
+            return struct.pack("<HHIIHHHHIH", 0xFFFE, 1, 48000, 192000, 4, 32, 22, valid, 4, 1) + bytes.fromhex(
+                "000000001000800000AA00389B71")
+        body = b"fmt " + struct.pack("<I", 40) + extensible(24) + b"data" + struct.pack("<I", 48000 * 4) + bytes(4800 * 4)
+        self.write("cut.wav", b"RIFF" + struct.pack("<I", 60 + 48000 * 4) + b"WAVE" + body)
+        text, _ = self.on_terminal("info", "cut.wav", NO_COLOR="1")
+        self.assertIn("0:00.100 of 0:01.000  48 kHz  24 in 32-bit", text)
+        item = self.json("info", "cut.wav")[0]
+        self.assertEqual([item[key] for key in ("isWhole", "missingBytes", "promisedFrames", "frames", "sourceBits", "coding")],
+                         [False, 43200 * 4, 48000, 4800, 24, "PCM"])
+        self.write("a.wav", wave())
+        item = self.json("info", "a.wav")[0]
+        self.assertTrue(item["isWhole"])
+        self.assertFalse({"missingBytes", "promisedFrames", "bitRate"} & set(item))
+        for name, word, options in (("b.wav", "RIFX", ("-B",)), ("b.au", "NeXT", ())):
+            subprocess.run(["sox", "a.wav", *options, name], cwd=self.folder, check=True)
+            item = self.json("info", name, env=self.without_decoders())[0]
+            self.assertEqual([item[key] for key in ("fileType", "coding", "frames", "bitsPerSample")], [word, "PCM", 100, 16])
 
     def test_forms(self):
         self.write("a.wav", wave())

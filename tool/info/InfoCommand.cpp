@@ -1,4 +1,5 @@
 // ktfiles info: what audio files are.
+#include "tool/info/CodingWords.h"
 #include "tool/shared/access/FileAccess.h"
 #include "tool/shared/arguments/CommandLine.h"
 #include "tool/shared/input/FileByFile.h"
@@ -9,7 +10,7 @@
 #include "tool/shared/output/JsonRecords.h"
 #include "tool/shared/output/Table.h"
 
-#include <algorithm>
+#include <cmath>
 
 namespace {
 
@@ -56,52 +57,28 @@ std::string channelsText(int channels)
     return channels == 1 ? "mono" : channels == 2 ? "stereo" : fmt::format("{} channels", channels);
 }
 
-std::string containerText(const AudioFileInfo& info)
+/// What the headers promise, where that is more than there is; 0 where it cannot be told.
+std::int64_t promisedFrames(const AudioFileInfo& info)
 {
-    static constexpr std::pair<FourCC, const char*> names[] = {
-        {kRIFF, "WAVE"},
-        {kCaff, "CAF"},
-        {kCAT, "REX2"},
-        {fourCC("MPG3"), "MP3"},
-        {fourCC("adts"), "AAC"},
-        {fourCC("M4A "), "M4A"},
-        {fourCC("mpg4"), "MP4"},
-        {fourCC("flac"), "FLAC"},
-        {fourCC("ogg "), "Ogg"},
-        {fourCC("asf "), "WMA"},
-        {fourCC("NeXT"), "AU"},
-        {fourCC("wvpk"), "WavPack"},
-        {fourCC("ape "), "APE"},
-        {fourCC("ac-3"), "AC-3"},
-        {fourCC("MPG2"), "MP2"},
-        {fourCC("tta "), "TTA"},
-        {fourCC("tak "), "TAK"},
-        {fourCC("W64f"), "Wave64"},
-        {fourCC("mkv "), "Matroska"},
-    };
-    if (info.containerId == kFORM)
-        return fourCCText(info.formType);
-    const auto* const known = std::find_if(std::begin(names), std::end(names),
-                                           [&](const auto& name) { return name.first == info.containerId; });
-    return known != std::end(names) ? known->second : fourCCText(info.containerId);
+    return info.missingDataSize > 0 && info.bytesPerFrame > 0 ? info.frames + info.missingDataSize / info.bytesPerFrame
+                                                              : 0;
 }
 
-// ".mp3" and "aac " as people know them.
-std::string codingText(FourCC coding)
+std::string lengthText(const AudioFileInfo& info)
 {
-    std::string text = fourCCText(coding);
-    text.erase(text.find_last_not_of(' ') + 1);
-    return text.starts_with('.') ? text.substr(1) : text;
+    const std::string there = durationText(durationOf(info));
+    const std::int64_t promised = promisedFrames(info);
+    if (promised == 0 || info.exactSampleRate <= 0)
+        return info.missingDataSize > 0 ? there + ", cut" : there;
+    return fmt::format("{} of {}", there, durationText(static_cast<double>(promised) / info.exactSampleRate));
 }
 
-std::string formatText(const AudioFileInfo& info)
+/// Of compressed sound, bits per second; 0 where it cannot be told.
+std::int64_t bitRateOf(const AudioFileInfo& info)
 {
-    constexpr FourCC kWaveTag = 0x6D730000; // "ms" and the number of the format in a WAVE file
-    if (info.compressed && (info.formatCode & 0xFFFF0000) == kWaveTag)
-        return fmt::format("format 0x{:04X}", info.formatCode & 0xFFFF);
-    if (info.compressed)
-        return codingText(info.formatCode);
-    return fmt::format("{}-bit{}", info.bitsPerSample, info.floatingPoint ? " float" : "");
+    const double duration = durationOf(info);
+    const std::int64_t bytes = info.dataSize > 0 ? info.dataSize : info.fileLength;
+    return info.compressed && duration > 0 ? std::llround(static_cast<double>(bytes) * 8 / duration) : 0;
 }
 
 std::string typeByNameText(const FileFacts& facts)
@@ -117,11 +94,21 @@ void writeJson(JsonWriter& json, const std::string& path, const AudioFileInfo& i
     json.member("fileType", fourCCText(info.fileType));
     json.member("formatCode", fourCCText(info.formatCode));
     json.member("sampleRate", info.sampleRate);
+    json.member("coding", codingWord(info));
     json.member("bitsPerSample", info.bitsPerSample);
+    if (info.sourceBits > 0)
+        json.member("sourceBits", info.sourceBits);
+    if (const std::int64_t rate = bitRateOf(info); rate > 0)
+        json.member("bitRate", rate);
     json.member("channels", info.channels);
     json.member("floatingPoint", info.floatingPoint);
     json.member("frames", info.frames);
     json.member("durationSeconds", durationOf(info));
+    json.member("isWhole", info.missingDataSize == 0);
+    if (info.missingDataSize > 0)
+        json.member("missingBytes", info.missingDataSize);
+    if (const std::int64_t frames = promisedFrames(info); frames > 0)
+        json.member("promisedFrames", frames);
     json.member("dataOffset", info.dataOffset);
     json.member("fileLength", info.fileLength);
     json.member("typeByName", typeByNameText(facts));
@@ -181,8 +168,8 @@ public:
 private:
     void addRow(const std::string& path, const AudioFileInfo& info, const FileFacts& facts)
     {
-        std::vector<std::string> row{printable(path), containerText(info), durationText(durationOf(info)),
-                                     rateText(info),  formatText(info),    channelsText(info.channels)};
+        std::vector<std::string> row{printable(path), containerWord(info), lengthText(info),
+                                     rateText(info),  formatWords(info),   channelsText(info.channels)};
         if (isLong_) {
             const auto& stereo = facts.stereo;
             row.push_back(typeByNameText(facts));
@@ -194,8 +181,8 @@ private:
 
     void addLine(const std::string& path, const AudioFileInfo& info, const FileFacts& facts)
     {
-        output_.print("{}\t{}\t{:.6f}\t{}\t{}\t{}", printable(path), containerText(info), durationOf(info),
-                      info.sampleRate, formatText(info), info.channels);
+        output_.print("{}\t{}\t{:.6f}\t{}\t{}\t{}", printable(path), containerWord(info), durationOf(info),
+                      info.sampleRate, formatWords(info), info.channels);
         if (isLong_)
             output_.print("\t{}\t{}\t{}\t{}", typeByNameText(facts), dateText(facts.modified),
                           facts.stereo ? printable(facts.stereo->partner) : "",

@@ -1,0 +1,15 @@
+// What containers and codings are called by those who use them.
+#pragma once
+
+#include "audiofile/AudioFileInfo.h"
+
+#include <string>
+
+/// "WAVE", "AIFC", "Ogg"; the four characters of the container where it has no other name.
+std::string containerWord(const AudioFileInfo& info);
+/// "MP3", "Vorbis", "IMA ADPCM"; "PCM" for linear samples. What has no name: its four characters, or "format 0x0161",
+/// the number that WAVE has for it.
+std::string codingWord(const AudioFileInfo& info);
+/// What a sample is: "16-bit", "24 in 32-bit", "32-bit float" of linear PCM; "FLAC 24-bit" of what loses nothing; the
+/// coding elsewhere.
+std::string formatWords(const AudioFileInfo& info);

@@ -135,6 +135,9 @@ class Edits(ProjectTest):
         self.assertEqual(self.json("project", "Tune.fuguex")["projectInfo"]["VariantNames"],
                          {"0": "Tune", "1": "Tune, slower"})
         self.assertIn("no alternative 2", self.failure("project", "rename-alternative", "Tune.fuguex", "2", "x"))
+        # A value in brackets is a text as any other.
+        self.run_command("project", "rename-alternative", "--in-place", "Tune.fuguex", "1", "[Intro]")
+        self.assertEqual(self.json("project", "Tune.fuguex")["alternatives"][1]["name"], "[Intro]")
 
     def test_interrupted_exchange_is_told_and_settled(self):
         self.put(BACKUPS + "00/ProjectData", b"old")

@@ -157,7 +157,8 @@ std::int32_t CAFPackets::checkCoding()
     if (id == fourCC("aac ") || id == fourCC("alac") || isOpaqueCoding(id))
         return kStatusOK;
     if (id == fourCC("ima4")) {
-        const bool isUsual = format_.framesPerPacket == 64 && format_.bytesPerPacket == 34 * format_.channelsPerFrame;
+        const bool isUsual = format_.framesPerPacket == 64 && format_.bytesPerPacket == 34 * format_.channelsPerFrame &&
+                             format_.sampleRate > 0;
         return isUsual ? kStatusOK : AudioHandle::kFormatNotSupported;
     }
     if (id != fourCC(".mp3"))

@@ -3,8 +3,10 @@
 
 #include "platform/Log.h"
 #include "platform/SystemCalls.h"
+#include "platform/core/CRC32.h"
 
 #include <algorithm>
+#include <array>
 #include <cerrno>
 #include <cstdlib>
 #include <cstring>
@@ -275,4 +277,21 @@ std::int32_t CFileIO::Allocate(long long length, bool preallocate)
     const std::int32_t status = SetEOF(length);
     // As much as the file held before is reserved beyond its new end; to be set to the length it has gives that back.
     return status == kStatusOK && isReserved && end > 0 ? SetEOF(length) : status;
+}
+
+std::uint32_t CFileIO::CRC()
+{
+    constexpr long pieceSize = 10240;
+    constexpr std::uint32_t noCRC = 0xFFFFFFFF;
+    std::array<char, pieceSize> buffer;
+    std::uint32_t crc = 0;
+    for (long long left = GetEOF(); left > 0;) {
+        const auto piece = static_cast<long>(std::min<long long>(pieceSize, left));
+        // Kept: from the mark on and not from the start, which is for the caller to set.
+        if (Read(buffer.data(), piece) != kStatusOK)
+            return noCRC;
+        crc = ECCRC32(crc, buffer.data(), static_cast<std::size_t>(piece));
+        left -= piece;
+    }
+    return crc;
 }

@@ -1,8 +1,7 @@
-// The operations of CFileIO that pass over a whole file.
+// CFileIO: moving a part of a file within it.
 #include "files/CFileIO.h"
 
 #include "platform/SystemCalls.h"
-#include "platform/core/CRC32.h"
 
 #include <algorithm>
 #include <array>
@@ -13,8 +12,6 @@
 namespace {
 
 constexpr long kMovePiece = 1048576;
-constexpr long kCRCPiece = 10240;
-constexpr std::uint32_t kNoCRC = 0xFFFFFFFF;
 
 } // namespace
 
@@ -88,19 +85,4 @@ std::int32_t CFileIO::ReadPiece(void* buffer, long long position, long count)
         return Read(buffer, position, count, nullptr);
     long ignored = 0;
     return ReadDirect(buffer, position, count, count, &ignored);
-}
-
-std::uint32_t CFileIO::CRC()
-{
-    std::array<char, kCRCPiece> buffer;
-    std::uint32_t crc = 0;
-    for (long long left = GetEOF(); left > 0;) {
-        const auto piece = static_cast<long>(std::min<long long>(kCRCPiece, left));
-        // Kept: from the mark on and not from the start, which is for the caller to set.
-        if (Read(buffer.data(), piece) != kStatusOK)
-            return kNoCRC;
-        crc = ECCRC32(crc, buffer.data(), static_cast<std::size_t>(piece));
-        left -= piece;
-    }
-    return crc;
 }

@@ -63,6 +63,8 @@ public:
     /// "WAVE", "AIFF", "REX2", or 0: what kind of chunked container is open. CAF files have a walk of their own and
     /// give 0.
     FourCC IsChunkBased();
+    /// Whether the open file has chunks: IsChunkBased() knows its container, or it is CAF.
+    bool HasChunks();
     /// 0, or -3.
     std::int32_t ReadExtendedFileHeader(ContainerChkExtended& header);
     /// The position of the chunk after `current`, whose header goes to `next`; position 0 asks for the first. The walk

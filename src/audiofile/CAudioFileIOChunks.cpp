@@ -39,6 +39,11 @@ FourCC CAudioFileIO::IsChunkBased()
     return IsOpen() && Read(start.data(), 0, start.size(), nullptr) == kStatusOK ? ChunkedContainerKind(start) : 0;
 }
 
+bool CAudioFileIO::HasChunks()
+{
+    return IsOpen() && (mInfo.fileType == kCaff || IsChunkBased() != 0);
+}
+
 std::int32_t CAudioFileIO::ReadExtendedFileHeader(ContainerChkExtended& header)
 {
     return ReadContainerHeader(*this, header);
@@ -86,7 +91,7 @@ std::int32_t CAudioFileIO::ForEachChunk(const std::function<bool(const ChunkEntr
             return visitor(id, position, size == -1 && id == kData ? toTheEnd : size);
         });
     }
-    if (ContainerKind(window) == 0)
+    if (ChunkedContainerKind(window) == 0)
         return kNoContainer;
     ContainerChkExtended header;
     if (ReadContainerHeader(window, header) != kStatusOK)
@@ -127,7 +132,7 @@ std::int32_t CAudioFileIO::Locate(FourCC id, FoundChunk& found)
             });
         return status == kStatusOK ? result : status;
     }
-    if (ContainerKind(window) == 0)
+    if (ChunkedContainerKind(window) == 0)
         return kNoContainer;
     ContainerChkExtended header;
     if (ReadContainerHeader(window, header) != kStatusOK)

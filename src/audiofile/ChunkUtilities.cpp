@@ -50,7 +50,7 @@ bool isUnfinished(const CFileRef& sidecar)
 
 bool takesChunks(CAudioFileIO& file)
 {
-    return file.IsOpen() && (file.IsChunkBased() != 0 || file.Info().fileType == kCaff);
+    return file.HasChunks();
 }
 
 bool isTaggedLoop(const AudioFileInfo& info)

@@ -59,7 +59,7 @@ std::int32_t ContainerEditor::appendToContainer(FourCC id, BytesView body)
     if (const std::int32_t status = file_.GetEOF(&length); status != kStatusOK)
         return status;
     FileWindow window(file_, length);
-    if (ContainerKind(window) == 0)
+    if (ChunkedContainerKind(window) == 0)
         return unlessUnreadable(window, kNoChunkedContainer);
     ContainerChkExtended header;
     if (ReadContainerHeader(window, header) != kStatusOK)
@@ -242,7 +242,7 @@ std::int32_t ContainerEditor::findAll(FileWindow& window, FourCC id, const Conta
         });
         return window.failure();
     }
-    if (ContainerKind(window) == 0)
+    if (ChunkedContainerKind(window) == 0)
         return window.failure();
     WalkChunks(window, header, ContainerEnd(header, window.length()), [&](const WalkedChunk& chunk) {
         if (chunk.header.id == id) {

@@ -20,8 +20,8 @@ struct WalkedChunk {
 inline constexpr std::int32_t kFirstChunkUnreadable = -3;
 inline constexpr std::int32_t kWalkStuck = -8;
 
-/// The kind of container, as ChunkedContainerKind.
-inline FourCC ContainerKind(FileWindow& file)
+/// The same of the file behind a window.
+inline FourCC ChunkedContainerKind(FileWindow& file)
 {
     std::array<std::byte, 16> start;
     return file.read(start.data(), 0, start.size()) == kStatusOK ? ChunkedContainerKind(start) : 0;

@@ -53,7 +53,7 @@ AdmSource::AdmSource(const std::string& path)
     const std::int64_t length = file_.GetEOF();
     if (length == 0)
         throw Failure("is empty");
-    if (file_.Info().fileType == kCaff || file_.IsChunkBased() != 0) {
+    if (file_.HasChunks()) {
         isAudio_ = true;
         const ChunkBody chunk = requireChunk(file_, fourCC("axml"));
         begin_ = chunk.offset;

@@ -135,7 +135,7 @@ bool keepsItsChunks(const std::string& path)
 {
     CAudioFileIO file;
     requireOK(file.Open(referenceTo(path), 0));
-    return file.Info().fileType == kCaff || file.IsChunkBased() != 0;
+    return file.HasChunks();
 }
 
 SidecarChunk readFromAnywhere(const std::string& path, FourCC id, const std::string& extension)
@@ -173,7 +173,7 @@ std::optional<std::string> Sidecars::objection() const
         return std::nullopt;
     CAudioFileIO file;
     requireOK(file.Open(referenceTo(raw_), 0));
-    if (file.Info().fileType == 0 && file.IsChunkBased() == 0)
+    if (file.Info().fileType == 0 && !file.HasChunks())
         return std::nullopt;
     return raw_ + " is an audio file of its own, and would be lost as an older copy of the chunk";
 }

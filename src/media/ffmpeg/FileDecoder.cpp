@@ -143,7 +143,7 @@ std::int32_t FileDecoder::describeAsDecoded()
     limit_ = count;
     if (status = restart(); status != kStatusOK)
         return status;
-    describe(fileType, file, *frames, 0, count, FileHandle::unknownCount);
+    describe(fileType, file, *frames, 0, count, DecodedFileHandle::unknownCount);
     if (const auto stated = SoundDigest::statedBy(*demuxer_.stream().codecpar)) // of the file opened again
         noteChecksum(*stated, file.bitsPerChannel);
     forget();

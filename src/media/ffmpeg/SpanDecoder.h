@@ -3,7 +3,7 @@
 #pragma once
 
 #include "media/decoding/AudioDecoder.h"
-#include "media/ffmpeg/FileHandle.h"
+#include "media/ffmpeg/DecodedFileHandle.h"
 #include "media/ffmpeg/FrameSpans.h"
 #include "media/ffmpeg/SoundDigest.h"
 
@@ -61,7 +61,7 @@ private:
     std::int32_t bring(std::uint64_t number);
 
     StreamDescription fileFormat_, frameFormat_;
-    std::optional<FileHandle> handle_;
+    std::optional<DecodedFileHandle> handle_;
     std::uint32_t speakers_ = 0;
     std::uint64_t first_ = 0;
     std::uint64_t frameCount_ = 0;

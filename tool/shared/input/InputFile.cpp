@@ -57,6 +57,6 @@ void openContainer(CAudioFileIO& file, const std::string& path, unsigned int mod
     requireOK(file.Open(referenceTo(path), mode));
     if (file.GetEOF() == 0)
         throw Failure("is empty");
-    if (file.Info().fileType != kCaff && file.IsChunkBased() == 0)
+    if (!file.HasChunks())
         throw Failure("no container known here (RIFF, RF64, BW64, AIFF, AIFC, REX2, CAF)");
 }

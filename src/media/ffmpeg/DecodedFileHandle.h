@@ -8,11 +8,11 @@
 namespace platform::ffmpeg {
 
 /// Answers with the type, the format and the number of packets, where that is known; takes no property.
-class FileHandle final : public AudioHandle {
+class DecodedFileHandle final : public AudioHandle {
 public:
     static constexpr std::uint64_t unknownCount = ~std::uint64_t{0};
 
-    FileHandle(FourCC type, const StreamDescription& format, std::uint64_t packetCount);
+    DecodedFileHandle(FourCC type, const StreamDescription& format, std::uint64_t packetCount);
     std::int32_t propertyInfo(FourCC id, std::uint32_t& size, bool& isWritable) override;
     std::int32_t property(FourCC id, std::uint32_t& size, void* data) override;
     std::int32_t setProperty(FourCC id, std::uint32_t size, const void* data) override;

@@ -1,10 +1,10 @@
-#include "media/ffmpeg/FileHandle.h"
+#include "media/ffmpeg/DecodedFileHandle.h"
 
 #include "platform/core/Status.h"
 
 namespace platform::ffmpeg {
 
-FileHandle::FileHandle(FourCC type, const StreamDescription& format, std::uint64_t packetCount)
+DecodedFileHandle::DecodedFileHandle(FourCC type, const StreamDescription& format, std::uint64_t packetCount)
     : AudioHandle(Kind::file),
       type_(type),
       format_(format),
@@ -13,7 +13,7 @@ FileHandle::FileHandle(FourCC type, const StreamDescription& format, std::uint64
     lend();
 }
 
-std::int32_t FileHandle::propertyInfo(FourCC id, std::uint32_t& size, bool& isWritable)
+std::int32_t DecodedFileHandle::propertyInfo(FourCC id, std::uint32_t& size, bool& isWritable)
 {
     isWritable = false;
     size = id == AudioFile::fileTypeProperty                                      ? sizeof type_
@@ -23,7 +23,7 @@ std::int32_t FileHandle::propertyInfo(FourCC id, std::uint32_t& size, bool& isWr
     return size > 0 ? kStatusOK : AudioFile::kUnsupportedProperty;
 }
 
-std::int32_t FileHandle::property(FourCC id, std::uint32_t& size, void* data)
+std::int32_t DecodedFileHandle::property(FourCC id, std::uint32_t& size, void* data)
 {
     std::uint32_t have = 0;
     bool isWritable;
@@ -35,7 +35,7 @@ std::int32_t FileHandle::property(FourCC id, std::uint32_t& size, void* data)
     return give(value, have, size, data);
 }
 
-std::int32_t FileHandle::setProperty(FourCC, std::uint32_t, const void*)
+std::int32_t DecodedFileHandle::setProperty(FourCC, std::uint32_t, const void*)
 {
     return AudioFile::kUnsupportedProperty;
 }

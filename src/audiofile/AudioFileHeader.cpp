@@ -4,6 +4,7 @@
 
 #include "audiofile/BusFormats.h"
 #include "audiofile/ContainerHeaders.h"
+#include "media/containers/ExtendedFloat.h"
 #include "platform/core/ByteWriter.h"
 
 #include <array>
@@ -95,15 +96,6 @@ Bytes waveHeader(const Layout& layout, bool reserve)
     return out.take();
 }
 
-// A whole number as an 80-bit extended float; positive.
-void writeExtendedFloat(ByteWriter& out, std::int64_t value)
-{
-    const auto significand = static_cast<std::uint64_t>(value);
-    const int leadingZeros = std::countl_zero(significand);
-    out.write(static_cast<std::uint16_t>(16383 + 63 - leadingZeros));
-    out.write(significand << leadingZeros);
-}
-
 Bytes aiffHeader(const Layout& layout)
 {
     constexpr std::uint32_t versionOfAIFC = 0xA2805140;
@@ -128,7 +120,9 @@ Bytes aiffHeader(const Layout& layout)
     out.write(static_cast<std::int16_t>(layout.channels));
     out.write(static_cast<std::uint32_t>(std::min(layout.frames, kMost32)));
     out.write(static_cast<std::int16_t>(layout.bits));
-    writeExtendedFloat(out, layout.sampleRate);
+    std::array<std::byte, platform::kExtendedSize> rate;
+    platform::storeExtended(rate.data(), static_cast<double>(layout.sampleRate));
+    out.write(rate);
     if (layout.isFloat) {
         out.writeFourCC(layout.bits == 64 ? fourCC("fl64") : fourCC("fl32"));
         out.write(static_cast<std::uint8_t>(name.size()));

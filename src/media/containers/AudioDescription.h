@@ -30,8 +30,4 @@ inline constexpr std::uint64_t kCommonFramesOffset = 2;
 /// come. Empty when the container cannot hold the format. Bytes per packet and frames per packet need not be given.
 Bytes newAudioFile(FourCC fileType, StreamDescription format);
 
-/// 80-bit extended floating point, big-endian, as in "COMM" (IEEE 754, x87 form). Zero for what is no finite number.
-double loadExtended(const std::byte* bytes);
-void storeExtended(std::byte* bytes, double value);
-
 } // namespace platform

@@ -1,4 +1,5 @@
 #include "media/containers/AudioDescription.h"
+#include "media/containers/ExtendedFloat.h"
 #include "platform/core/ByteWriter.h"
 
 #include <cmath>

@@ -1,6 +1,6 @@
 #include "media/containers/StoredFormat.h"
 
-#include "media/containers/AudioDescription.h"
+#include "media/containers/ExtendedFloat.h"
 #include "platform/core/ByteReader.h"
 
 #include <algorithm>
@@ -160,7 +160,7 @@ std::optional<StoredFormat> storedFormatOfAIFF(BytesView bytes, bool isAIFC)
     stream.channelsPerFrame = static_cast<std::uint32_t>(std::max<int>(reader.read<std::int16_t>(), 0));
     format.countedPackets = reader.read<std::uint32_t>();
     stream.bitsPerChannel = static_cast<std::uint32_t>(std::max<int>(reader.read<std::int16_t>(), 0));
-    stream.sampleRate = loadExtended(reader.take(10).data());
+    stream.sampleRate = loadExtended(reader.take(kExtendedSize).data());
     FourCC type = fourCC("NONE");
     if (isAIFC && bytes.size() >= plainSize + sizeof(FourCC))
         type = reader.readFourCC();

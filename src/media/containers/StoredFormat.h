@@ -13,8 +13,8 @@
 
 namespace platform {
 
-/// Wave64 and AU are only read.
-enum class ContainerKind : std::uint8_t { riff, iff, caf, wave64, au };
+/// Wave64 and AU are only read; of REX2 only the chunks are known.
+enum class ContainerKind : std::uint8_t { riff, iff, caf, wave64, au, rex2 };
 
 struct StoredFormat {
     /// Of linear PCM bytesPerFrame is what a frame takes, 0 where that cannot be; samples fill their bytes from the

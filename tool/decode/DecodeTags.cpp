@@ -4,6 +4,7 @@
 #include "audiofile/ContainerHeaders.h"
 #include "loops/tagging/CAFPayloads.h"
 #include "loops/tagging/ChunkIDs.h"
+#include "media/containers/ChunkRole.h"
 #include "tool/shared/input/InputFile.h"
 #include "tool/shared/looptags/LoopTagFields.h"
 
@@ -14,11 +15,9 @@
 
 namespace {
 
-// What the sound is made of, room, and what can be made from the sound again.
-constexpr FourCC kOfTheSound[] = {
-    fourCC("fmt "), fourCC("fact"), fourCC("data"), fourCC("ds64"), fourCC("COMM"), fourCC("FVER"), fourCC("SSND"),
-    fourCC("desc"), fourCC("pakt"), fourCC("kuki"), fourCC("chan"), fourCC("free"), fourCC("JUNK"), fourCC("junk"),
-    fourCC("PAD "), fourCC("FLLR"), fourCC("PEAK"), fourCC("peak"), fourCC("LGWV"), fourCC("ovvw"), fourCC("ovwf")};
+// Room that other programs leave, and what can be made from the sound again.
+constexpr FourCC kOfNoUse[] = {fourCC("junk"), fourCC("PAD "), fourCC("FLLR"), fourCC("PEAK"),
+                               fourCC("peak"), fourCC("LGWV"), fourCC("ovvw"), fourCC("ovwf")};
 // Loop tags, in files that can hold some. "uuid" and "info" of CAF are looked into.
 constexpr FourCC kOfTags[] = {tagging::kBasicTagging,  tagging::kCategories,
                               tagging::kTransients,    tagging::kChannelStrip0,
@@ -30,6 +29,14 @@ constexpr FourCC kOfTags[] = {tagging::kBasicTagging,  tagging::kCategories,
                               fourCC("info"),          fourCC("NAME"),
                               fourCC("AUTH"),          fourCC("(c) "),
                               fourCC("COMT")};
+
+bool isOfTheSound(FourCC id)
+{
+    using Kind = platform::ContainerKind;
+    const auto isPart = [id](Kind kind) { return platform::roleOfChunk(kind, id) != platform::ChunkRole::userData; };
+    return isPart(Kind::riff) || isPart(Kind::iff) || isPart(Kind::caf) ||
+           std::ranges::find(kOfNoUse, id) != std::end(kOfNoUse);
+}
 
 std::string nameOf(FourCC id)
 {
@@ -74,7 +81,7 @@ std::vector<std::string> otherChunks(const std::string& path, bool holdsTags)
     if (file.Open(referenceTo(path), 0) != kStatusOK)
         return others;
     file.ForEachChunk([&](const ChunkEntry& chunk) {
-        const bool isTold = std::ranges::find(kOfTheSound, chunk.id) != std::end(kOfTheSound) ||
+        const bool isTold = isOfTheSound(chunk.id) ||
                             (holdsTags && std::ranges::find(kOfTags, chunk.id) != std::end(kOfTags)) ||
                             std::ranges::find(others, nameOf(chunk.id)) != others.end();
         if (!isTold)

@@ -1,12 +1,12 @@
 #include "media/userdata/AudioFileService.h"
 
+#include "media/containers/ChunkRole.h"
 #include "media/userdata/AudioFileImplementation.h"
 #include "media/userdata/UserDataEditor.h"
 #include "platform/SystemCalls.h"
 #include "platform/core/Status.h"
 
 #include <algorithm>
-#include <array>
 #include <cstdio>
 #include <functional>
 #include <limits>
@@ -14,18 +14,6 @@
 namespace platform {
 
 namespace {
-
-/// What makes up a container or tells how to read its samples: no user data to change.
-bool isStructural(ContainerKind kind, FourCC type)
-{
-    static constexpr std::array riff{fourCC("fmt "), fourCC("fact"), fourCC("data"), fourCC("ds64"), fourCC("JUNK")};
-    static constexpr std::array iff{fourCC("COMM"), fourCC("FVER"), fourCC("SSND")};
-    static constexpr std::array caf{fourCC("desc"), fourCC("data"), fourCC("pakt"), fourCC("kuki"), fourCC("chan")};
-    const auto isIn = [type](const auto& types) { return std::ranges::find(types, type) != types.end(); };
-    if (type == 0 || type == ContainerLayout::filler)
-        return true;
-    return kind == ContainerKind::riff ? isIn(riff) : kind == ContainerKind::iff ? isIn(iff) : isIn(caf);
-}
 
 std::int32_t failure()
 {
@@ -201,7 +189,7 @@ std::int32_t AudioFile::Implementation::findItem(FourCC type, std::uint32_t inde
 
 std::int32_t AudioFile::Implementation::checkEdit(FourCC type) const
 {
-    if (isStructural(layout.kind, type))
+    if (type == 0 || roleOfChunk(layout.kind, type) != ChunkRole::userData)
         return kStatusParameterError;
     return isWritable ? kStatusOK : kStatusWritePermission;
 }

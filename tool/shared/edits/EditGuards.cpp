@@ -1,41 +1,25 @@
 #include "tool/shared/edits/EditGuards.h"
 
 #include "audiofile/ContainerTail.h"
+#include "media/containers/ChunkRole.h"
 #include "tool/shared/input/ChunkBody.h"
 #include "tool/shared/output/Failure.h"
 
 #include <fmt/format.h>
 
 #include <algorithm>
-#include <array>
-#include <span>
-#include <string_view>
 
 namespace {
 
-// Chunks without which the sound, or the way to it, is gone. A container has one of each.
-std::span<const std::string_view> structuralChunks(FourCC container)
-{
-    static constexpr std::array<std::string_view, 3> wave{"fmt ", "data", "ds64"};
-    static constexpr std::array<std::string_view, 2> aiff{"COMM", "SSND"};
-    static constexpr std::array<std::string_view, 4> caf{"desc", "data", "pakt", "kuki"};
-    static constexpr std::array<std::string_view, 1> rex{"HEAD"};
-    switch (container) {
-    case kFORM:
-        return aiff;
-    case kCaff:
-        return caf;
-    case kCAT:
-        return rex;
-    default:
-        return wave;
-    }
-}
-
+// Whether it makes up the sound, or the way to it. A container has one of each.
 bool isStructural(FourCC container, FourCC id)
 {
-    const auto chunks = structuralChunks(container);
-    return std::find(chunks.begin(), chunks.end(), fourCCText(id)) != chunks.end();
+    using Kind = platform::ContainerKind;
+    const Kind kind = container == kFORM   ? Kind::iff
+                      : container == kCaff ? Kind::caf
+                      : container == kCAT  ? Kind::rex2
+                                           : Kind::riff;
+    return platform::roleOfChunk(kind, id) == platform::ChunkRole::essential;
 }
 
 // What the library finds to be at fault, in words.

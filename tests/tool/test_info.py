@@ -41,6 +41,12 @@ class Info(CommandTest):
                 item = self.json("info", path)[0]
                 self.assertEqual([item[key] for key in ("frames", "bitsPerSample", "fileLength")],
                                  [44100, 0, path.stat().st_size])
+        # AAC in LOAS, and WAVE behind a tag of MP3.
+        item = self.json("info", self.encoded("a.latm", "-c:a", "aac", "-f", "latm"))[0]
+        self.assertEqual((item["coding"], item["sampleRate"]), ("AAC", 44100))
+        tag = b"ID3\x03\0\0\0\0\0\x0a" + bytes(10)
+        self.write("tagged.wav", tag + wave())
+        self.assertEqual(self.lines("info", "tagged.wav"), ["tagged.wav\tWAVE\t0.002083\t48000\t16-bit\t1"])
         # What the library finds by itself needs no module; for the rest the message names what does.
         plain = self.without_decoders()
         for name in ("a.mp3", "a.m4a", "a.flac"):

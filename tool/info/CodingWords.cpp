@@ -106,6 +106,8 @@ std::string codingWord(const AudioFileInfo& info)
 
 std::string formatWords(const AudioFileInfo& info)
 {
+    if (info.compressed && info.formatCode == fourCC("lpcm") && info.sourceBits > 0) // behind a tag
+        return fmt::format("{}-bit", info.sourceBits);
     if (info.compressed)
         return info.sourceBits > 0 ? fmt::format("{} {}-bit", codingWord(info), info.sourceBits) : codingWord(info);
     if (info.floatingPoint)

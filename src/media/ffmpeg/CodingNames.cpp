@@ -23,6 +23,7 @@ constexpr Coding codings[] = {
     {AV_CODEC_ID_MP2, fourCC(".mp2")},
     {AV_CODEC_ID_MP1, fourCC(".mp1")},
     {AV_CODEC_ID_AAC, fourCC("aac ")},
+    {AV_CODEC_ID_AAC_LATM, fourCC("aac ")},
     {AV_CODEC_ID_ALAC, fourCC("alac")},
     {AV_CODEC_ID_FLAC, fourCC("flac")},
     {AV_CODEC_ID_OPUS, fourCC("opus")},

@@ -1,5 +1,6 @@
 // The CAF side of the combined tags: pairs of texts.
 #include "loops/VireoLoopCombinedTagsChunkDataTypes.h"
+#include "loops/VireoLoopTerms.h"
 #include "loops/tagging/CAFPayloads.h"
 #include "loops/tagging/LoopTiming.h"
 #include "platform/String.h"
@@ -11,11 +12,6 @@ using platform::Dictionary;
 using SearchInfo = VireoLoopCombinedTagsChunkDataTypes::SearchInfo;
 
 namespace {
-
-constexpr std::int64_t kLowestNamedNote = 48;
-// Kept: this mix of flats and sharps is the vocabulary.
-constexpr const char* kNoteNames[] = {"C", "Db", "D", "D#", "E", "F", "F#", "G", "G#", "A", "A#", "B"};
-constexpr const char* kKeyTypeNames[] = {"any", "minor", "major", "neither", "both"};
 
 std::vector<std::string> split(std::string_view text, char separator)
 {
@@ -44,12 +40,13 @@ std::int64_t numberFor(const Dictionary& tags, const char* key)
 
 void addKey(const Dictionary& tags, tagging::StringPairs& strings)
 {
-    const std::int64_t note = numberFor(tags, VireoLoopCombinedTagsChunkDataMidiRootNoteKey) - kLowestNamedNote;
-    if (note < 0 || note >= std::ssize(kNoteNames))
+    const std::string_view note = VireoLoopNoteName(numberFor(tags, VireoLoopCombinedTagsChunkDataMidiRootNoteKey));
+    if (note.empty())
         return;
     const std::int64_t type = numberFor(tags, VireoLoopCombinedTagsChunkDataKeyType);
-    strings["key signature"] = kNoteNames[note];
-    strings["key type"] = kKeyTypeNames[type > 0 && type < std::ssize(kKeyTypeNames) ? type : 0];
+    const std::string_view mode = VireoLoopModeName(type);
+    strings["key signature"] = note;
+    strings["key type"] = type == 0 || mode.empty() ? "any" : mode;
 }
 
 void addTexts(const Dictionary& tags, tagging::StringPairs& strings)
@@ -101,10 +98,7 @@ std::int64_t VireoLoopCombinedTagsChunkDataTypes::rootNoteKeyFromCafDict(const S
 std::int64_t VireoLoopCombinedTagsChunkDataTypes::keyTypeFromCafDict(const SearchInfo& info)
 {
     const std::string* name = firstOf(info, "key type");
-    for (std::int64_t type = 1; name != nullptr && type < std::ssize(kKeyTypeNames); ++type)
-        if (*name == kKeyTypeNames[type])
-            return type;
-    return 0;
+    return name != nullptr ? VireoLoopModeNamed(*name).value_or(0) : 0;
 }
 
 Dictionary VireoLoopCombinedTagsChunkDataTypes::combinedTagsChunkDataDictionaryFromCafChunkData(BytesView payload)

@@ -1,6 +1,7 @@
 #include "tool/shared/looptags/LoopTagFields.h"
 
 #include "loops/VireoLoopChunks.h"
+#include "loops/VireoLoopTerms.h"
 #include "platform/String.h"
 #include "tool/shared/arguments/UsageError.h"
 #include "tool/shared/output/Terminal.h"
@@ -39,10 +40,6 @@ constexpr TagField kFields[] = {
     {"comments", VireoLoopFileInfoChunkDataCommentsKey, Kind::text, true},
     {"transients", nullptr, Kind::transients},
 };
-
-constexpr std::int64_t kLowestNamedNote = 48;
-constexpr std::string_view kNoteNames[] = {"C", "Db", "D", "D#", "E", "F", "F#", "G", "G#", "A", "A#", "B"};
-constexpr std::string_view kModeNames[] = {"none", "minor", "major", "neither", "both"};
 
 [[noreturn]] void refuse(const std::string& message)
 {
@@ -90,21 +87,18 @@ Value numberValue(const TagField& field, std::string_view key, std::string_view 
 // A note's name, any of those for the same key: "F#" and "Gb", "B#" and "C".
 Value noteValue(std::string_view text)
 {
-    constexpr int kNotes[] = {9, 11, 0, 2, 4, 5, 7}; // A to G
-    const char letter = text.empty() ? '\0' : static_cast<char>(text[0] & ~0x20);
-    const std::string_view accidental = text.substr(std::min<std::size_t>(1, text.size()));
-    const int shift = accidental == "#" ? 1 : accidental == "b" ? -1 : 0;
-    if (letter < 'A' || letter > 'G' || (shift == 0 && !accidental.empty()))
+    const auto note = VireoLoopNoteNamed(text);
+    if (!note)
         refuseValue("key", text, "a note such as C, F# or Bb");
-    return kLowestNamedNote + (kNotes[letter - 'A'] + shift + 12) % 12;
+    return *note;
 }
 
 Value modeValue(std::string_view text)
 {
-    const auto found = std::find(std::begin(kModeNames), std::end(kModeNames), text);
-    if (found == std::end(kModeNames))
+    const auto mode = VireoLoopModeNamed(text);
+    if (!mode)
         refuseValue("mode", text, "none, minor, major, neither or both");
-    return found - std::begin(kModeNames);
+    return *mode;
 }
 
 Value descriptorsValue(std::string_view text)
@@ -240,14 +234,14 @@ TagArguments parseKeys(std::span<const std::string> arguments)
 
 std::string noteName(std::int64_t note)
 {
-    const std::int64_t named = note - kLowestNamedNote;
-    return named >= 0 && named < std::ssize(kNoteNames) ? std::string(kNoteNames[named]) : std::to_string(note);
+    const std::string_view name = VireoLoopNoteName(note);
+    return name.empty() ? std::to_string(note) : std::string(name);
 }
 
 std::string modeName(std::int64_t keyType)
 {
-    return keyType >= 0 && keyType < std::ssize(kModeNames) ? std::string(kModeNames[keyType])
-                                                            : std::to_string(keyType);
+    const std::string_view name = VireoLoopModeName(keyType);
+    return name.empty() ? std::to_string(keyType) : std::string(name);
 }
 
 std::string carriedChunkName(const VireoLoopBaseChunk& chunk)

@@ -2,6 +2,7 @@
 
 #include "audiofile/CAudioFileIO.h"
 #include "audiofile/ContainerHeaders.h"
+#include "loops/VireoLoopTerms.h"
 #include "loops/VireoLoopUserDataUtils.h"
 #include "tool/shared/input/InputFile.h"
 #include "tool/shared/looptags/LoopTagFields.h"
@@ -178,9 +179,7 @@ std::string LoopTags::text(std::string_view key) const
 
 double LoopTags::tempo() const
 {
-    const std::int64_t beats = number(VireoLoopCombinedTagsChunkDataBeatCountKey);
-    const bool known = beats > 0 && frames > 0 && std::isfinite(sampleRate) && sampleRate > 0;
-    return known ? static_cast<double>(beats) * 60 * sampleRate / static_cast<double>(frames) : 0;
+    return VireoLoopTempo(number(VireoLoopCombinedTagsChunkDataBeatCountKey), frames, sampleRate);
 }
 
 const char* loopContainerName(FourCC fileType)

@@ -1,6 +1,7 @@
 // The CAF side of LoopTagsPatch.
 #include "audiofile/ContainerHeaders.h"
 #include "loops/VireoLoopCombinedTagsChunkDataTypes.h"
+#include "loops/VireoLoopTerms.h"
 #include "tool/shared/looptags/CAFTextPairs.h"
 #include "tool/shared/looptags/LoopTagsLayouts.h"
 
@@ -43,7 +44,6 @@ const char* cafKeyOf(const TagField& field)
 // The text that stands for a value; empty when none does.
 std::string cafText(const TagField& field, const Value& value)
 {
-    constexpr std::int64_t lowestNote = 48, highestNote = 59, lastKeyType = 4;
     const std::int64_t number = assignedNumber(value);
     if (field.kind == TagField::Kind::text)
         return assignedText(value);
@@ -52,8 +52,8 @@ std::string cafText(const TagField& field, const Value& value)
     if (field.key == kBeatCount)
         return number > 0 ? std::to_string(number) : "";
     if (field.key == kRootNote)
-        return number >= lowestNote && number <= highestNote ? noteName(number) : "";
-    return number > 0 && number <= lastKeyType ? modeName(number) : "";
+        return std::string(VireoLoopNoteName(number));
+    return std::string(number > 0 ? VireoLoopModeName(number) : "");
 }
 
 // Nothing changes where the library reads what is asked for already; a text is compared as it stands.

@@ -4,28 +4,11 @@
 #include "files/CFileUtilDates.h"
 #include "tool/shared/input/InputFile.h"
 
-#include <array>
-#include <cmath>
-#include <ctime>
 #include <vector>
 
 #include <sys/stat.h>
 
 namespace {
-
-constexpr double kFrom1970To2001 = 978'307'200;
-
-template <class Convert>
-std::string formatted(const std::optional<platform::Date>& date, const char* format, Convert convert)
-{
-    std::tm parts = {};
-    std::array<char, 64> text;
-    if (!date)
-        return "";
-    const auto seconds = static_cast<std::time_t>(std::floor(date->secondsSince2001 + kFrom1970To2001));
-    const bool known = convert(&seconds, &parts) != nullptr;
-    return known ? std::string(text.data(), std::strftime(text.data(), text.size(), format, &parts)) : "";
-}
 
 bool isFile(const std::string& path)
 {
@@ -78,14 +61,4 @@ FileFacts factsOf(const std::string& path)
 {
     const CFileRef file = referenceTo(path);
     return {CFileUtilFileType(file), stereoHalf(path), CFileUtilGetModificationDate(file)};
-}
-
-std::string dateText(const std::optional<platform::Date>& date)
-{
-    return formatted(date, "%Y-%m-%dT%H:%M:%SZ", ::gmtime_r);
-}
-
-std::string localDateText(const std::optional<platform::Date>& date)
-{
-    return formatted(date, "%Y-%m-%d %H:%M", ::localtime_r);
 }

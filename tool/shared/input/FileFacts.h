@@ -25,8 +25,3 @@ struct FileFacts {
 
 /// Throws Failure for what is no regular file.
 FileFacts factsOf(const std::string& path);
-
-/// "2024-01-15T12:00:00Z"; empty for none.
-std::string dateText(const std::optional<platform::Date>& date);
-/// The same in local time, for people: "2024-01-15 13:00".
-std::string localDateText(const std::optional<platform::Date>& date);

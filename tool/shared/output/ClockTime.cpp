@@ -10,6 +10,23 @@
 #include <ctime>
 #include <string_view>
 
+namespace {
+
+template <class Convert>
+std::string calendarText(const std::optional<platform::Date>& date, const char* format, Convert convert)
+{
+    constexpr double kUnixTimeOf2001 = 978'307'200, kFarthest = 1e12;
+    if (!date || !(std::abs(date->secondsSince2001) < kFarthest))
+        return "";
+    std::tm parts = {};
+    char text[32];
+    const auto seconds = static_cast<std::time_t>(std::floor(date->secondsSince2001 + kUnixTimeOf2001));
+    const bool isKnown = convert(&seconds, &parts) != nullptr;
+    return isKnown ? std::string(text, std::strftime(text, sizeof text, format, &parts)) : "";
+}
+
+} // namespace
+
 std::string clockText(double seconds, int decimals, ShowHours showHours)
 {
     const auto unitsPerSecond = static_cast<std::int64_t>(std::llround(std::pow(10.0, decimals)));
@@ -68,14 +85,12 @@ std::optional<SoundLength> soundLengthFromText(const std::string& text)
     return error == std::errc() && rest == end ? std::optional(length) : std::nullopt;
 }
 
-std::string dateText(platform::Date date)
+std::string dateText(const std::optional<platform::Date>& date)
 {
-    constexpr double kUnixTimeOf2001 = 978307200;
-    const double seconds = date.secondsSince2001 + kUnixTimeOf2001;
-    std::tm parts = {};
-    char text[32];
-    const auto time = static_cast<std::time_t>(std::abs(seconds) < 1e12 ? std::floor(seconds) : 0);
-    if (::gmtime_r(&time, &parts) == nullptr || std::strftime(text, sizeof text, "%Y-%m-%dT%H:%M:%SZ", &parts) == 0)
-        return {};
-    return text;
+    return calendarText(date, "%Y-%m-%dT%H:%M:%SZ", ::gmtime_r);
+}
+
+std::string localDateText(const std::optional<platform::Date>& date)
+{
+    return calendarText(date, "%Y-%m-%d %H:%M", ::localtime_r);
 }

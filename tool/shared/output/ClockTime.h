@@ -30,5 +30,7 @@ struct SoundLength {
 /// another text.
 std::optional<SoundLength> soundLengthFromText(const std::string& text);
 
-/// "2026-11-21T09:30:00Z"; empty for a date that the calendar does not reach.
-std::string dateText(platform::Date date);
+/// "2026-11-21T09:30:00Z"; empty for none, and for a date that the calendar does not reach.
+std::string dateText(const std::optional<platform::Date>& date);
+/// The same in local time, for people: "2026-11-21 10:30".
+std::string localDateText(const std::optional<platform::Date>& date);

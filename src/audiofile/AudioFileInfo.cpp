@@ -104,6 +104,20 @@ void SetSampleData(AudioFileInfo& info, std::int64_t offset, std::uint64_t size)
     info.missingDataSize = size < toTheEnd ? static_cast<std::int64_t>(size) - info.dataSize : 0;
 }
 
+void SetSoundFacts(AudioFileInfo& info, const platform::SoundFacts& facts)
+{
+    constexpr std::uint64_t most = INT64_MAX;
+    if (info.speakers == 0)
+        info.speakers = facts.speakers;
+    info.profile = facts.profile;
+    info.audioTracks = static_cast<std::int32_t>(std::min<std::uint32_t>(facts.tracks, INT32_MAX));
+    info.dsdRate = static_cast<std::int64_t>(std::min(facts.bitstreamRate, most));
+    const auto promised = static_cast<std::int64_t>(std::min(facts.promisedFrames, most));
+    info.promisedFrames = std::max(info.promisedFrames, promised);
+    if (info.promisedFrames <= info.frames)
+        info.promisedFrames = 0;
+}
+
 void SetLoopTiming(AudioFileInfo& info, const std::optional<tagging::LoopTiming>& timing)
 {
     if (!timing)

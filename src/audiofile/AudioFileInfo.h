@@ -2,6 +2,7 @@
 #pragma once
 
 #include "media/samples/SampleConversion.h"
+#include "media/samples/SoundFacts.h"
 #include "platform/core/Export.h"
 #include "platform/core/FourCC.h"
 
@@ -62,6 +63,16 @@ struct KT_EXPORT AudioFileInfo {
     std::int32_t sourceBits = 0; // of a sample those that count: 20 of 24; of lossless codings those of what was coded;
                                  // else 0
 
+    // What else the file says of its sound.
+    std::uint32_t speakers = 0; // those that the channels feed, as bits of WAVE's channel mask, whatever the channels'
+                                // order; 0 when the file does not say
+    platform::CodingProfile profile = platform::CodingProfile::unknown;
+    std::int32_t audioTracks = 1;    // of which this is the first
+    std::int64_t promisedFrames = 0; // of compressed data: by the headers; 0 where they promise none
+    std::int64_t dsdRate = 0;        // of 1-bit sound, which is described as the PCM that it decodes to; else 0
+
+    /// Whether all is there that the headers promise.
+    bool IsWhole() const { return missingDataSize == 0 && promisedFrames <= frames; }
     bool IsLinearPCM() const { return !compressed && bytesPerFrame > 0 && sampleFormat.isSupported(); }
     /// 5,000 times the tempo in beats per minute, from beat count, rate and frames; 32 low bits.
     std::uint32_t VireoLoopTempo() const;

@@ -4,6 +4,7 @@
 #include "audiofile/ContainerWalk.h"
 
 #include "loops/tagging/ChunkIDs.h"
+#include "media/containers/ChannelLayouts.h"
 #include "media/decoding/CompressedAudio.h"
 #include "platform/core/ByteReader.h"
 
@@ -23,7 +24,8 @@ struct Chunks {
     bool hasDescription = false; // a chunk of that id, if only the start of one
     std::optional<PacketTable> packetTable;
     std::optional<tagging::LoopTiming> timing;
-    std::uint32_t speakers = 0;
+    std::uint32_t speakers = 0; // that the channels feed in their order
+    std::uint32_t layout = 0;   // the same in any order
     bool hasData = false;
 };
 
@@ -56,6 +58,15 @@ std::uint32_t readSpeakers(FileWindow& file, std::int64_t body)
     return named ? loadBE<std::uint32_t>(bytes.data() + 4) : 0;
 }
 
+std::uint32_t readLayout(FileWindow& file, std::int64_t body)
+{
+    std::array<std::byte, 8> bytes;
+    return file.read(bytes.data(), body, bytes.size()) == kStatusOK
+               ? platform::speakersOfLayout(loadBE<std::uint32_t>(bytes.data()),
+                                            loadBE<std::uint32_t>(bytes.data() + 4))
+               : 0;
+}
+
 std::optional<tagging::LoopTiming> readLoopTiming(FileWindow& file, std::int64_t body, std::int64_t size)
 {
     constexpr std::int64_t most = 1 << 20; // bytes of text that are looked at
@@ -86,6 +97,7 @@ void readChunk(FileWindow& file, FourCC id, std::int64_t body, std::int64_t size
         chunks.packetTable = readPacketTable(file, body);
     } else if (id == fourCC("chan")) {
         chunks.speakers = readSpeakers(file, body);
+        chunks.layout = readLayout(file, body);
     } else if (id == kUuid && !chunks.timing) {
         chunks.timing = readLoopTiming(file, body, size);
     } else if (id == kData && !chunks.hasData) {
@@ -135,6 +147,7 @@ void setCompressedFrames(const platform::URLRef& url, const Chunks& chunks, Audi
     info.sourceBits = static_cast<std::int32_t>(packets.format.bitsPerChannel);
     info.busFormat = BusFormatOf(chunks.speakers, info.channels);
     info.frames = static_cast<std::int64_t>(packets.frames);
+    SetSoundFacts(info, packets.facts);
 }
 
 } // namespace
@@ -147,6 +160,7 @@ std::int32_t DescribeCAF(FileWindow& file, const platform::URLRef& url, AudioFil
         return kStatusEndOfFile;
     SetStoredFormat(info, *chunks.format);
     info.busFormat = BusFormatOf(chunks.speakers, info.channels);
+    info.speakers = chunks.layout;
     if (info.compressed)
         setCompressedFrames(url, chunks, info);
     else

@@ -33,6 +33,7 @@ std::int32_t CAudioFileIO::OpenDecoder(platform::Error* error)
     constexpr std::uint64_t most = std::numeric_limits<std::int64_t>::max();
     mInfo.frames = static_cast<std::int64_t>(std::min(decoder->frameCount(), most));
     mInfo.framesAreStated = false;
+    SetSoundFacts(mInfo, decoder->facts());
     SetSampleRate(mInfo, found.sampleRate);
     if (const auto channels = static_cast<std::int32_t>(found.channelsPerFrame); channels != mInfo.channels) {
         mInfo.channels = channels;

@@ -33,6 +33,8 @@ void SetSampleRate(AudioFileInfo& info, double rate);
 void SetStoredFormat(AudioFileInfo& info, const platform::StoredFormat& format);
 /// Sets the sample data: `size` bytes at `offset`, of which those beyond the end of the file are not counted.
 void SetSampleData(AudioFileInfo& info, std::int64_t offset, std::uint64_t size);
+/// Sets what else is known of the sound, behind the frames; what the container has said already stays.
+void SetSoundFacts(AudioFileInfo& info, const platform::SoundFacts& facts);
 /// Sets the loop fields, behind all others.
 void SetLoopTiming(AudioFileInfo& info, const std::optional<tagging::LoopTiming>& timing);
 

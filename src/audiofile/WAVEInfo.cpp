@@ -107,6 +107,7 @@ std::int32_t DescribeWAVE(FileWindow& file, AudioFileInfo& info)
         return kStatusEndOfFile;
     const platform::StoredFormat& format = *chunks.format;
     SetStoredFormat(info, format);
+    info.speakers = format.speakers.value_or(0);
     if (format.speakers)
         info.busFormat = BusFormatOf(*format.speakers, info.channels);
     if (info.compressed)

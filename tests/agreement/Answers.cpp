@@ -74,6 +74,7 @@ Answer describedFile(const std::string& path)
     answer.rate = info.exactSampleRate;
     answer.channels = info.channels;
     answer.frames = info.frames;
+    answer.speakers = info.speakers;
     answer.isCompressed = info.compressed;
     return answer;
 }
@@ -93,6 +94,8 @@ Answer streamedFile(const std::string& path)
     answer.rate = format.sampleRate;
     answer.channels = format.channelsPerFrame;
     answer.frames = propertyOf<std::int64_t>(opened, platform::ConvertingReader::frameCountProperty);
+    answer.speakers =
+        static_cast<platform::ConvertingReader*>(static_cast<platform::AudioHandle*>(opened))->facts().speakers;
     const std::int64_t read = framesRead(opened, format.bytesPerFrame);
     if (read < 0) // says why not
         answer.status = static_cast<std::int32_t>(read);
@@ -126,5 +129,11 @@ std::string disagreement(const std::string& path)
         return offersSound || overview.status == kStatusOK ? all : "";
     }
     const bool isEmpty = streamed.frames == 0 && overview.status == kStatusEndOfFile; // nothing to show
+    // A container may say what its coding does not, and the other way round.
+    const bool isContained =
+        described.type == fourCC("WAVE") || described.type == fourCC("AIFF") || described.type == fourCC("caff");
+    const bool areSaid = !isContained || (described.speakers != 0 && streamed.speakers != 0);
+    if (described.isCompressed && areSaid && described.speakers != streamed.speakers)
+        return all + "; speakers " + std::to_string(described.speakers) + " and " + std::to_string(streamed.speakers);
     return described.isSame(streamed) && (isEmpty || overview.isSame(streamed)) ? "" : all;
 }

@@ -13,7 +13,8 @@ struct Answer {
     double rate = 0;
     std::int64_t channels = 0;
     std::int64_t frames = 0;
-    bool isCompressed = false; // by the description: then the coding may be one that nothing decodes
+    std::uint32_t speakers = 0; // of description and stream
+    bool isCompressed = false;  // by the description: then the coding may be one that nothing decodes
 
     /// "WAVE 44100 Hz 2 ch 1000 frames", or the status.
     std::string text() const;

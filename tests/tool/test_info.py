@@ -32,7 +32,7 @@ class Info(CommandTest):
     @needs_decoders
     def test_compressed_files(self):
         for name, row in (("a.mp3", ["MP3", "1.000000", "44100", "MP3", "2"]),
-                          ("a.m4a", ["M4A", "1.000000", "44100", "AAC", "2"]),
+                          ("a.m4a", ["M4A", "1.000000", "44100", "AAC-LC", "2"]),
                           ("a.flac", ["FLAC", "1.000000", "44100", "FLAC 16-bit", "2"]),
                           ("a.ogg", ["Ogg", "1.000000", "44100", "FLAC 16-bit", "2"])):
             with self.subTest(name):
@@ -43,7 +43,7 @@ class Info(CommandTest):
                                  [44100, 0, path.stat().st_size])
         # AAC in LOAS, and WAVE behind a tag of MP3.
         item = self.json("info", self.encoded("a.latm", "-c:a", "aac", "-f", "latm"))[0]
-        self.assertEqual((item["coding"], item["sampleRate"]), ("AAC", 44100))
+        self.assertEqual((item["coding"], item["sampleRate"]), ("AAC-LC", 44100))
         tag = b"ID3\x03\0\0\0\0\0\x0a" + bytes(10)
         self.write("tagged.wav", tag + wave())
         self.assertEqual(self.lines("info", "tagged.wav"), ["tagged.wav\tWAVE\t0.002083\t48000\t16-bit\t1"])
@@ -72,6 +72,97 @@ class Info(CommandTest):
             subprocess.run(["sox", "a.wav", *options, name], cwd=self.folder, check=True)
             item = self.json("info", name, env=self.without_decoders())[0]
             self.assertEqual([item[key] for key in ("fileType", "coding", "frames", "bitsPerSample")], [word, "PCM", 100, 16])
+
+    @needs_decoders
+    def test_profile_and_layout_are_those_that_ffprobe_tells(self):
+        six, mono = ("-af", "pan=5.1|c0=c0|c1=c1|c2=c0|c3=c0|c4=c0|c5=c1"), ("-ac", "1")
+        for name, options in (("a.m4a", ()), ("six.m4a", six), ("low.aac", ("-ar", "22050")), ("mono.aac", mono),
+                              ("six.aac", six), ("a.mp3", ()), ("mono.mp3", mono), ("six.flac", six), ("six.ac3", six),
+                              ("six.wv", six), ("six.caf", ("-c:a", "alac", *six)), ("six.ogg", six), ("six.wav", six),
+                              ("alac.m4a", ("-c:a", "alac", *six)), ("six.mka", six), ("side.wav", (*six, "-channel_layout", "5.1(side)")),
+                              ("three.flac", ("-af", "pan=2.1|c0=c0|c1=c1|c2=c0"))):
+            with self.subTest(name):
+                path = self.encoded(name, *options, seconds=0.3)
+                probed = json.loads(subprocess.run(
+                    ["ffprobe", "-v", "error", "-show_streams", "-of", "json", path], capture_output=True).stdout)["streams"][0]
+                item = self.json("info", name)[0]
+                self.assertEqual(item.get("channelLayout"), re.sub(r"\(.*\)", "", probed.get("channel_layout", "")) or None)
+                if probed["codec_name"] == "aac":
+                    self.assertEqual(item["coding"], "AAC-" + probed["profile"])
+        # Nothing is said where the file says nothing; the names of several speakers together; orders of CAF's own.
+        self.write("plain.wav", wave())
+        self.assertNotIn("channelLayout", self.json("info", "plain.wav")[0])
+        mask = struct.pack("<HHIIHHHHIH", 0xFFFE, 3, 48000, 288000, 6, 16, 22, 16, 0x803, 1) + bytes.fromhex(
+            "000000001000800000AA00389B71")
+        body = b"WAVEfmt " + struct.pack("<I", 40) + mask + b"data" + struct.pack("<I", 600) + bytes(600)
+        self.write("odd.wav", b"RIFF" + struct.pack("<I", len(body)) + body)
+        self.assertEqual(self.json("info", "odd.wav")[0]["channelLayout"], "L+R+Tc")
+        self.write("order.caf", caf((b"chan", struct.pack(">III", 123 << 16 | 6, 0, 0))))
+        self.assertEqual(self.json("info", "order.caf")[0]["channelLayout"], "5.1")
+
+    @needs_decoders
+    def test_first_of_several_tracks(self):
+        self.encoded("mono.wav", "-ac", "1", seconds=1)
+        self.encoded("stereo.wav", seconds=2)
+        for name, options in (("a.m4a", ()), ("alac.mov", ("-c:a", "alac")), ("a.mka", ("-c:a", "flac")),
+                              ("ac3.mp4", ("-c:a", "ac3")), ("a.ts", ("-c:a", "mp2"))):
+            with self.subTest(name):
+                subprocess.run(["ffmpeg", "-v", "error", "-i", "mono.wav", "-i", "stereo.wav", "-map", "0", "-map", "1", *options,
+                                "-disposition:a:1", "default", name], cwd=self.folder, check=True)
+                item = self.json("info", name)[0]
+                self.assertEqual((item["channels"], item["audioTracks"], round(item["durationSeconds"])), (1, 2, 1))
+                self.assertNotIn("bitRate", item)
+                self.assertIn("mono, first of 2 tracks", self.on_terminal("info", "-l", name, NO_COLOR="1")[0])
+                self.run_command("decode", name, "-o", "out.wav", "--force", "--quiet")
+                out = self.json("info", "out.wav")[0]
+                self.assertEqual((out["channels"], out["frames"]), (1, item["frames"]))
+
+    @needs_decoders
+    def test_dsd_has_a_rate_of_its_own(self):
+        def dsf(rate, data=bytes(range(256)) * 32):
+            fmt = b"fmt " + struct.pack("<QIIIIIIQII", 52, 1, 0, 2, 2, rate, 1, len(data) * 4, 4096, 0)
+            body = fmt + b"data" + struct.pack("<Q", 12 + len(data)) + data
+            return b"DSD " + struct.pack("<QQQ", 28, 28 + len(body), 0) + body
+        def dff(rate, data=bytes(range(256)) * 32):
+            def chunk(name, content):
+                return name + struct.pack(">Q", len(content)) + content + b"\0" * (len(content) & 1)
+            prop = b"SND " + chunk(b"FS  ", struct.pack(">I", rate)) + chunk(b"CHNL", b"\0\2SLFTSRGT") + chunk(
+                b"CMPR", b"DSD \x0enot compressed")
+            body = b"DSD " + chunk(b"FVER", b"\1\5\0\0") + chunk(b"PROP", prop) + chunk(b"DSD ", data)
+            return b"FRM8" + struct.pack(">Q", len(body)) + body
+        for name, make, rate, word in (("a.dsf", dsf, 2822400, "2.8224"), ("b.dff", dff, 5644800, "5.6448")):
+            with self.subTest(name):
+                self.write(name, make(rate))
+                item = self.json("info", name)[0]
+                self.assertEqual([item[key] for key in ("dsdRate", "sampleRate", "coding", "channels", "frames", "isWhole")],
+                                 [rate, rate // 8, "DSD", 2, 4096, True])
+                line = self.lines("info", name)[0].split("\t")
+                self.assertEqual((line[1], line[4]), (name[2:].upper(), f"DSD {word} MHz"))
+                subprocess.run(["wavpack", "-q", name, "-o", "packed.wv", "-y"], cwd=self.folder, check=True)
+                item = self.json("info", "packed.wv")[0]
+                self.assertEqual((item["dsdRate"], item["frames"]), (rate, 4096))
+                self.assertIn(f"WavPack DSD {word} MHz", self.lines("info", "packed.wv")[0])
+
+    @needs_decoders
+    def test_cut_files_say_what_their_headers_promise(self):
+        for name, options in (("a.flac", ()), ("a.mp3", ()), ("a.m4a", ("-movflags", "faststart")), ("b.wv", ()), ("a.tta", ()),
+                              ("a.caf", ("-c:a", "alac")), ("ac3.mp4", ("-c:a", "ac3", "-movflags", "faststart")),
+                              ("he.m4a", ("-ar", "22050", "-movflags", "faststart"))):
+            with self.subTest(name):
+                path = self.encoded(name, *options, seconds=3)
+                whole = self.json("info", name)[0]
+                self.assertTrue(whole["isWhole"])
+                self.assertNotIn("promisedFrames", whole)
+                content = path.read_bytes()
+                if name == "a.caf":  # its packet table moves ahead of the samples
+                    data, table = content.index(b"data"), content.rindex(b"pakt")
+                    content = content[:data] + content[table:] + content[data:table]
+                path.write_bytes(content[:len(content) // 2])
+                cut = self.json("info", name)[0]
+                self.assertFalse(cut["isWhole"])
+                self.assertLess(cut["frames"], whole["frames"])
+                self.assertAlmostEqual(cut["promisedFrames"], whole["frames"], delta=4096)  # CAF counts whole packets
+                self.assertIn(" of 0:03.0", self.on_terminal("info", name, NO_COLOR="1")[0])
 
     def test_forms(self):
         self.write("a.wav", wave())

@@ -88,7 +88,7 @@ void DecodeSource::setFormats(const DecodeWishes& wishes)
 void DecodeSource::lookInto(const std::string& path)
 {
     if (reader_->fileFormat().channelsPerFrame == sound_.channels)
-        sound_.busFormat = BusFormatOf(reader_->speakers(), static_cast<int>(sound_.channels));
+        sound_.busFormat = BusFormatOf(reader_->facts().speakers, static_cast<int>(sound_.channels));
     CAudioFileIO file;
     if (file.Open(referenceTo(path), 0) != kStatusOK || !file.Info().IsLinearPCM())
         return;

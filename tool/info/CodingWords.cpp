@@ -5,7 +5,7 @@
 #include <fmt/format.h>
 
 #include <algorithm>
-#include <span>
+#include <iterator>
 #include <utility>
 
 namespace {
@@ -42,9 +42,16 @@ constexpr Word containers[] = {
     {fourCC("mpc "), "Musepack"},
     {fourCC("mpc8"), "Musepack"},
     {fourCC("dsf "), "DSF"},
+    {fourCC("dff "), "DFF"},
     {fourCC("iff "), "IFF"},
     {fourCC("voc "), "VOC"},
     {fourCC("amrf"), "AMR"},
+    {fourCC("MPGT"), "MPEG-TS"},
+    {fourCC("mpeg"), "MPEG-PS"},
+    {fourCC("AVI "), "AVI"},
+    {fourCC("flv "), "FLV"},
+    {fourCC("shn "), "Shorten"},
+    {fourCC("nist"), "NIST SPHERE"},
 };
 
 // Those of WAVE by their registered numbers (RFC 2361 and its successors).
@@ -69,13 +76,37 @@ constexpr Word codings[] = {
     {tagged(0x55), "MP3"},           {tagged(0x92), "AC-3"},       {tagged(0xFF), "AAC"},
     {tagged(0x160), "WMA 1"},        {tagged(0x161), "WMA 2"},     {tagged(0x162), "WMA Pro"},
     {tagged(0x163), "WMA Lossless"}, {tagged(0x2000), "AC-3"},     {tagged(0x2001), "DTS"},
-    {tagged(0xF1AC), "FLAC"},
+    {tagged(0xF1AC), "FLAC"},        {fourCC("dsd_"), "DSD"},      {fourCC("dst "), "DST"},
 };
 
-const char* find(std::span<const Word> words, FourCC code)
+using platform::CodingProfile;
+constexpr std::pair<CodingProfile, const char*> profiles[] = {
+    {CodingProfile::aacMain, "AAC Main"},      {CodingProfile::aacLC, "AAC-LC"},
+    {CodingProfile::aacSSR, "AAC-SSR"},        {CodingProfile::aacLTP, "AAC-LTP"},
+    {CodingProfile::heAAC, "HE-AAC"},          {CodingProfile::aacLD, "AAC-LD"},
+    {CodingProfile::heAACv2, "HE-AAC v2"},     {CodingProfile::aacELD, "AAC-ELD"},
+    {CodingProfile::xHEAAC, "xHE-AAC"},        {CodingProfile::dtsES, "DTS-ES"},
+    {CodingProfile::dts9624, "DTS 96/24"},     {CodingProfile::dtsHDHighResolution, "DTS-HD HRA"},
+    {CodingProfile::dtsHDMaster, "DTS-HD MA"}, {CodingProfile::dtsExpress, "DTS Express"},
+};
+
+// By the speakers' bits; those behind and those beside the listener are called alike.
+constexpr std::pair<std::uint32_t, const char*> layouts[] = {
+    {0x4, "mono"},      {0x3, "stereo"},     {0xB, "2.1"},       {0x7, "3.0"},       {0x103, "3.0 (back)"},
+    {0xF, "3.1"},       {0x33, "quad"},      {0x603, "quad"},    {0x107, "4.0"},     {0x10F, "4.1"},
+    {0x37, "5.0"},      {0x607, "5.0"},      {0x3F, "5.1"},      {0x60F, "5.1"},     {0x137, "6.0"},
+    {0x707, "6.0"},     {0x13F, "6.1"},      {0x70F, "6.1"},     {0x637, "7.0"},     {0x63F, "7.1"},
+    {0xFF, "7.1 wide"}, {0x6CF, "7.1 wide"}, {0x503F, "5.1.2"},  {0x2D033, "4.0.4"}, {0x2D03F, "5.1.4"},
+    {0x563F, "7.1.2"},  {0x2D63F, "7.1.4"},  {0x2D6FF, "9.1.4"},
+};
+constexpr const char* speakers[] = {"L",  "R",  "C",  "LFE", "Lrs", "Rrs", "Lc",  "Rc",  "Cs",
+                                    "Ls", "Rs", "Tc", "Tfl", "Tfc", "Tfr", "Tbl", "Tbc", "Tbr"};
+
+template <class Table, class Key>
+const char* find(const Table& words, Key key)
 {
-    const auto found = std::ranges::find(words, code, &Word::first);
-    return found != words.end() ? found->second : nullptr;
+    const auto found = std::ranges::find(words, key, &std::ranges::range_value_t<Table>::first);
+    return found != std::end(words) ? found->second : nullptr;
 }
 
 std::string trimmed(FourCC code)
@@ -97,6 +128,8 @@ std::string containerWord(const AudioFileInfo& info)
 
 std::string codingWord(const AudioFileInfo& info)
 {
+    if (const char* const word = find(profiles, info.profile); word != nullptr)
+        return word;
     if (const char* const word = find(codings, info.formatCode); word != nullptr)
         return word;
     if (const FourCC number = info.formatCode & 0xFFFF; info.formatCode == tagged(number))
@@ -104,8 +137,26 @@ std::string codingWord(const AudioFileInfo& info)
     return trimmed(info.formatCode);
 }
 
+std::string layoutWord(const AudioFileInfo& info)
+{
+    if (const char* const word = find(layouts, info.speakers); word != nullptr)
+        return word;
+    if (info.speakers >> std::size(speakers) != 0)
+        return {};
+    std::string words;
+    for (std::size_t i = 0; i < std::size(speakers); ++i)
+        if ((info.speakers >> i & 1) != 0)
+            words += (words.empty() ? "" : "+") + std::string(speakers[i]);
+    return words;
+}
+
 std::string formatWords(const AudioFileInfo& info)
 {
+    if (info.dsdRate > 0) {
+        const std::string coding = codingWord(info);
+        return fmt::format("{}{:.10g} MHz", coding == "DSD" ? "DSD " : coding + " DSD ",
+                           static_cast<double>(info.dsdRate) / 1e6);
+    }
     if (info.compressed && info.formatCode == fourCC("lpcm") && info.sourceBits > 0) // behind a tag
         return fmt::format("{}-bit", info.sourceBits);
     if (info.compressed)

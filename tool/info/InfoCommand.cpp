@@ -52,14 +52,25 @@ std::string rateText(const AudioFileInfo& info)
     return fmt::format("{:.10g} kHz", info.exactSampleRate / 1000);
 }
 
-std::string channelsText(int channels)
+std::string channelsText(const AudioFileInfo& info)
 {
-    return channels == 1 ? "mono" : channels == 2 ? "stereo" : fmt::format("{} channels", channels);
+    const std::string layout = layoutWord(info);
+    return !layout.empty()      ? layout
+           : info.channels == 1 ? "mono"
+           : info.channels == 2 ? "stereo"
+                                : fmt::format("{} channels", info.channels);
+}
+
+std::string tracksText(const AudioFileInfo& info)
+{
+    return info.audioTracks > 1 ? fmt::format(", first of {} tracks", info.audioTracks) : "";
 }
 
 /// What the headers promise, where that is more than there is; 0 where it cannot be told.
 std::int64_t promisedFrames(const AudioFileInfo& info)
 {
+    if (info.promisedFrames > info.frames)
+        return info.promisedFrames;
     return info.missingDataSize > 0 && info.bytesPerFrame > 0 ? info.frames + info.missingDataSize / info.bytesPerFrame
                                                               : 0;
 }
@@ -73,9 +84,11 @@ std::string lengthText(const AudioFileInfo& info)
     return fmt::format("{} of {}", there, durationText(static_cast<double>(promised) / info.exactSampleRate));
 }
 
-/// Of compressed sound, bits per second; 0 where it cannot be told.
+/// Of compressed sound, bits per second; 0 where it cannot be told, as of one track of several.
 std::int64_t bitRateOf(const AudioFileInfo& info)
 {
+    if (info.audioTracks > 1)
+        return 0;
     const double duration = durationOf(info);
     const std::int64_t bytes = info.dataSize > 0 ? info.dataSize : info.fileLength;
     return info.compressed && duration > 0 ? std::llround(static_cast<double>(bytes) * 8 / duration) : 0;
@@ -100,11 +113,17 @@ void writeJson(JsonWriter& json, const std::string& path, const AudioFileInfo& i
         json.member("sourceBits", info.sourceBits);
     if (const std::int64_t rate = bitRateOf(info); rate > 0)
         json.member("bitRate", rate);
+    if (info.dsdRate > 0)
+        json.member("dsdRate", info.dsdRate);
     json.member("channels", info.channels);
+    if (const std::string layout = layoutWord(info); !layout.empty())
+        json.member("channelLayout", layout);
+    if (info.audioTracks > 1)
+        json.member("audioTracks", info.audioTracks);
     json.member("floatingPoint", info.floatingPoint);
     json.member("frames", info.frames);
     json.member("durationSeconds", durationOf(info));
-    json.member("isWhole", info.missingDataSize == 0);
+    json.member("isWhole", info.IsWhole());
     if (info.missingDataSize > 0)
         json.member("missingBytes", info.missingDataSize);
     if (const std::int64_t frames = promisedFrames(info); frames > 0)
@@ -168,8 +187,9 @@ public:
 private:
     void addRow(const std::string& path, const AudioFileInfo& info, const FileFacts& facts)
     {
-        std::vector<std::string> row{printable(path), containerWord(info), lengthText(info),
-                                     rateText(info),  formatWords(info),   channelsText(info.channels)};
+        std::vector<std::string> row{printable(path),   containerWord(info),
+                                     lengthText(info),  rateText(info),
+                                     formatWords(info), channelsText(info) + (isLong_ ? tracksText(info) : "")};
         if (isLong_) {
             const auto& stereo = facts.stereo;
             row.push_back(typeByNameText(facts));
@@ -213,7 +233,8 @@ void declareInfo(CommandLine& commandLine)
     Verb& verb = commandLine.addVerb("info", "Say what audio files are: length, rate, format, channels",
                                      [&commandLine] { return runInfo(files, isLong, commandLine.output()); });
     CommandLine::addFiles(verb, files).required();
-    verb.addFlag("-l,--long", isLong, "Also the type by the name, the date of modification and the stereo partner");
+    verb.addFlag("-l,--long", isLong,
+                 "Also the number of tracks, the type by the name, the date of modification and the stereo partner");
 }
 
 const VerbRegistration registration{10, declareInfo};

@@ -4,6 +4,7 @@
 
 #include "media/containers/AudioHandle.h"
 #include "media/decoding/ConvertingReader.h"
+#include "media/samples/SoundFacts.h"
 
 #include <cstdint>
 
@@ -22,9 +23,8 @@ public:
     /// What read() gives: interleaved, packed linear PCM of a supported sample, at the file's rate and channel count.
     virtual const StreamDescription& frameFormat() const = 0;
     virtual std::uint64_t frameCount() const = 0;
-    /// Which speakers the channels feed, as bits of the channel mask of extensible WAVE, channels in their order; 0
-    /// when the file does not say.
-    virtual std::uint32_t speakers() const { return 0; }
+    /// What else the file says; channels stand in the order of the speakers' bits. None of linear PCM.
+    virtual SoundFacts facts() const { return {}; }
     /// False when the format has none.
     virtual bool packetTable(PacketTable&) const { return false; }
     /// Frames among those read so far for which the file has none that can be decoded: silence stands for them.

@@ -57,6 +57,11 @@ constexpr Beginning kBeginnings[] = {
     {4, "\xF8\x72\x6F\xBB", fourCC("mlp ")},
     {0, "\x56\xE0", fourCC("loas"), "\xFF\xE0"},
     {0, "FLV\x01", fourCC("flv ")},
+    {0,
+     {"\x47\x40\x00\x10", 4},
+     fourCC("MPGT"),
+     {"\xFF\xFF\xE0\xD0", 4}}, // a packet that begins a table, not scrambled
+    {0, {"\x00\x00\x01\xBA", 4}, fourCC("mpeg")},
     {0, ".RMF", fourCC("rm  ")},
     {8, "WAVE", fourCC("WAVE")}, // behind a tag
     {8, "AVI ", fourCC("AVI ")},
@@ -130,7 +135,7 @@ std::int32_t describePackets(const URL& url, CompressedAudio& audio)
     if (!packets)
         return status;
     audio = {packets->fileType(), packets->format(),
-             static_cast<std::uint64_t>(std::max<std::int64_t>(packets->table().validFrames, 0))};
+             static_cast<std::uint64_t>(std::max<std::int64_t>(packets->table().validFrames, 0)), packets->facts()};
     return kStatusOK;
 }
 
@@ -149,6 +154,7 @@ std::int32_t describeCompressedAudio(const URL& url, BytesView start, Compressed
         audio.format.sampleRate = reader->clientFormat().sampleRate;
         audio.format.channelsPerFrame = reader->clientFormat().channelsPerFrame;
         audio.frames = reader->frameCount();
+        audio.facts = reader->facts();
     }
     return status;
 }

@@ -2,6 +2,7 @@
 // MP3, AAC, M4A, and whatever else the decoder module reads.
 #pragma once
 
+#include "media/samples/SoundFacts.h"
 #include "media/samples/StreamDescription.h"
 #include "platform/URL.h"
 #include "platform/core/Bytes.h"
@@ -14,6 +15,7 @@ struct CompressedAudio {
     FourCC fileType = 0;      // "MPG3", "adts", "m4af", "mp4f"; of other files a code of their own
     StreamDescription format; // rate and channels are those of the frames that decoding gives
     std::uint64_t frames = 0;
+    SoundFacts facts;
     // Of linear PCM in a container that the library reads itself where its bytes stand; else 0.
     std::uint64_t dataOffset = 0;
     std::uint64_t byteCount = 0;

@@ -111,9 +111,9 @@ const StreamDescription& ConvertingReader::clientFormat() const
     return implementation_->client;
 }
 
-std::uint32_t ConvertingReader::speakers() const
+SoundFacts ConvertingReader::facts() const
 {
-    return implementation_->decoder->speakers();
+    return implementation_->decoder->facts();
 }
 
 std::uint64_t ConvertingReader::frameCount() const

@@ -5,6 +5,7 @@
 
 #include "media/containers/AudioHandle.h"
 #include "media/packets/PacketTable.h"
+#include "media/samples/SoundFacts.h"
 #include "media/samples/StreamDescription.h"
 #include "platform/URL.h"
 #include "platform/core/Bytes.h"
@@ -78,9 +79,9 @@ public:
     /// channels. Places and counts of frames are then those of the client's rate. A rate other than before sets the
     /// place to 0.
     std::int32_t setClientFormat(const StreamDescription& format, Error* error = nullptr);
-    /// Which speakers the file's channels feed, as bits of the channel mask of extensible WAVE, channels in their
-    /// order. 0 when it does not say, and of linear PCM that the library reads itself (CAudioFileIO tells).
-    std::uint32_t speakers() const;
+    /// What else the file says; channels stand in the order of the speakers' bits. None of linear PCM that the library
+    /// reads itself (CAudioFileIO tells).
+    SoundFacts facts() const;
     /// The file's frames, at its own rate.
     std::uint64_t frameCount() const;
     /// The frames that there are to read: at the client's rate those whose time is ahead of the file's end.

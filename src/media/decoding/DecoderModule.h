@@ -17,7 +17,7 @@ namespace platform {
 /// give an object for `delete`, or null with `*status`, AudioHandle::kFormatNotSupported when they know no way. They
 /// throw nothing.
 struct DecoderModule {
-    static constexpr std::uint32_t currentVersion = 2; // of this struct and of the interfaces; another is not used
+    static constexpr std::uint32_t currentVersion = 3; // of this struct and of the interfaces; another is not used
 
     std::uint32_t version;
     /// Takes the source over in any case.

@@ -2,6 +2,7 @@
 #pragma once
 
 #include "media/ffmpeg/Handles.h"
+#include "media/samples/SoundFacts.h"
 
 #include <cstdint>
 #include <memory>
@@ -27,6 +28,9 @@ public:
     virtual const AVFrame& frame() const = 0;
     /// Bits of a sample ahead of coding; 0 where that is not known.
     virtual int sourceBits() const = 0;
+    virtual CodingProfile profile() const { return CodingProfile::unknown; }
+    /// Whether the frames are made of 1-bit sound, of eight bits each.
+    virtual bool decodesDSD() const { return false; }
 
     enum class Result { frame, needsPacket, end, failed };
     /// The next frame of the packets sent. After `failed`, which is one packet's, it goes on.

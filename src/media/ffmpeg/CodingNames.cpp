@@ -1,6 +1,7 @@
 #include "media/ffmpeg/CodingNames.h"
 
 #include <algorithm>
+#include <span>
 
 extern "C" {
 #include <libavcodec/avcodec.h>
@@ -168,8 +169,43 @@ StreamDescription fileFormatOf(const AVCodecParameters& parameters, int sourceBi
     return format;
 }
 
-FourCC fileTypeOf(std::string_view demuxer, std::string_view brand)
+CodingProfile profileOf(int codec, int profile)
 {
+    struct Profile {
+        int number;
+        CodingProfile profile;
+    };
+    static constexpr Profile ofAAC[] = {
+        {FF_PROFILE_AAC_MAIN, CodingProfile::aacMain},    {FF_PROFILE_AAC_LOW, CodingProfile::aacLC},
+        {FF_PROFILE_AAC_SSR, CodingProfile::aacSSR},      {FF_PROFILE_AAC_LTP, CodingProfile::aacLTP},
+        {FF_PROFILE_AAC_HE, CodingProfile::heAAC},        {FF_PROFILE_AAC_HE_V2, CodingProfile::heAACv2},
+        {FF_PROFILE_AAC_LD, CodingProfile::aacLD},        {FF_PROFILE_AAC_ELD, CodingProfile::aacELD},
+        {FF_PROFILE_MPEG2_AAC_LOW, CodingProfile::aacLC}, {FF_PROFILE_MPEG2_AAC_HE, CodingProfile::heAAC},
+    };
+    static constexpr Profile ofDTS[] = {
+        {FF_PROFILE_DTS_ES, CodingProfile::dtsES},
+        {FF_PROFILE_DTS_96_24, CodingProfile::dts9624},
+        {FF_PROFILE_DTS_HD_HRA, CodingProfile::dtsHDHighResolution},
+        {FF_PROFILE_DTS_HD_MA, CodingProfile::dtsHDMaster},
+        {FF_PROFILE_DTS_EXPRESS, CodingProfile::dtsExpress},
+    };
+    const bool isAAC = codec == AV_CODEC_ID_AAC || codec == AV_CODEC_ID_AAC_LATM;
+    const std::span<const Profile> known = isAAC                      ? std::span<const Profile>(ofAAC)
+                                           : codec == AV_CODEC_ID_DTS ? std::span<const Profile>(ofDTS)
+                                                                      : std::span<const Profile>();
+    const auto found = std::ranges::find(known, profile, &Profile::number);
+    return found != known.end() ? found->profile : CodingProfile::unknown;
+}
+
+bool isDSD(int codec)
+{
+    return (codec >= AV_CODEC_ID_DSD_LSBF && codec <= AV_CODEC_ID_DSD_MSBF_PLANAR) || codec == AV_CODEC_ID_DST;
+}
+
+FourCC fileTypeOf(std::string_view demuxer, std::string_view brand, int codec)
+{
+    if (demuxer == "iff" && isDSD(codec))
+        return fourCC("dff ");
     if (brand.starts_with("M4A") || brand.starts_with("M4B"))
         return fourCC("m4af");
     const auto* found =

@@ -1,6 +1,7 @@
 // The system's names of codings and files beside FFmpeg's.
 #pragma once
 
+#include "media/samples/SoundFacts.h"
 #include "media/samples/StreamDescription.h"
 
 #include <string_view>
@@ -20,9 +21,14 @@ StreamDescription fileFormatOf(const AVCodecParameters& parameters, int sourceBi
 /// other; else 0.
 std::uint64_t framesOfBlocks(const AVCodecParameters& parameters, int bytes);
 
+/// Of FFmpeg's numbers of a coding (an AVCodecID) and its profile.
+CodingProfile profileOf(int codec, int profile);
+/// Whether a coding, an AVCodecID, is one of bits, of which the decoder makes PCM of an eighth of their rate.
+bool isDSD(int codec);
+
 /// "flac", "WAVE", …, after the name of a demultiplexer and, in movies, the brand; four characters of the
-/// demultiplexer's name for files that have no name elsewhere.
-FourCC fileTypeOf(std::string_view demuxer, std::string_view brand);
+/// demultiplexer's name for files that have no name elsewhere. `codec` is an AVCodecID.
+FourCC fileTypeOf(std::string_view demuxer, std::string_view brand, int codec);
 
 /// The demultiplexers that may be used, apart by commas: files of sound or of pictures with sound, which name no other
 /// files.

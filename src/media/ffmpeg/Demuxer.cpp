@@ -47,6 +47,24 @@ AVFormatContext* makeSilentContext()
     return context;
 }
 
+bool isAudio(const AVStream& stream)
+{
+    return stream.codecpar->codec_type == AVMEDIA_TYPE_AUDIO;
+}
+
+/// The first stream of audio that there is a decoder for, as readers of packets take it, and not the one that FFmpeg
+/// likes best; -1 without one.
+int firstAudioStream(const AVFormatContext& context)
+{
+    for (unsigned i = 0; i < context.nb_streams; ++i) {
+        const AVCodecParameters& parameters = *context.streams[i]->codecpar;
+        if (isAudio(*context.streams[i]) && parameters.sample_rate > 0 && parameters.ch_layout.nb_channels > 0 &&
+            avcodec_find_decoder(parameters.codec_id) != nullptr)
+            return static_cast<int>(i);
+    }
+    return -1;
+}
+
 /// avformat_find_stream_info, with silent decoders for the streams that are known by now.
 int findStreamInfo(AVFormatContext& context)
 {
@@ -86,8 +104,8 @@ std::int32_t Demuxer::open()
     result = findStreamInfo(*opened);
     if (result < 0)
         return statusOf(result);
-    stream_ = av_find_best_stream(opened.get(), AVMEDIA_TYPE_AUDIO, -1, -1, nullptr, 0);
-    if (stream_ < 0 || avcodec_find_decoder(opened->streams[stream_]->codecpar->codec_id) == nullptr)
+    stream_ = firstAudioStream(*opened);
+    if (stream_ < 0)
         return AudioHandle::kFormatNotSupported;
     for (unsigned i = 0; i < opened->nb_streams; ++i)
         if (static_cast<int>(i) != stream_)
@@ -99,6 +117,19 @@ std::int32_t Demuxer::open()
 const AVStream& Demuxer::stream() const
 {
     return *context_->streams[stream_];
+}
+
+unsigned Demuxer::audioStreams() const
+{
+    unsigned count = 0;
+    for (unsigned i = 0; i < context_->nb_streams; ++i)
+        count += isAudio(*context_->streams[i]) ? 1U : 0U;
+    return count;
+}
+
+unsigned Demuxer::streams() const
+{
+    return context_->nb_streams;
 }
 
 std::string_view Demuxer::name() const

@@ -19,6 +19,9 @@ public:
 
     bool isOpen() const { return context_ != nullptr; }
     const AVStream& stream() const;
+    /// Streams of audio, of which stream() is the first that can be decoded.
+    unsigned audioStreams() const;
+    unsigned streams() const;
     std::string_view name() const;
     /// What a movie says of its kind; else empty.
     std::string_view brand() const;

@@ -1,6 +1,7 @@
 #include "media/ffmpeg/FFmpegCodec.h"
 
 #include "media/containers/AudioHandle.h"
+#include "media/ffmpeg/CodingNames.h"
 #include "platform/core/Status.h"
 
 #include <new>
@@ -86,6 +87,16 @@ FFmpegCodec::FFmpegCodec(CodecContext context) : context_(std::move(context)), f
 int FFmpegCodec::sourceBits() const
 {
     return context_->bits_per_raw_sample;
+}
+
+CodingProfile FFmpegCodec::profile() const
+{
+    return profileOf(context_->codec_id, context_->profile);
+}
+
+bool FFmpegCodec::decodesDSD() const
+{
+    return isDSD(context_->codec_id);
 }
 
 Codec::Result FFmpegCodec::receive()

@@ -13,6 +13,8 @@ public:
 
     const AVFrame& frame() const override { return *frame_; }
     int sourceBits() const override;
+    CodingProfile profile() const override;
+    bool decodesDSD() const override;
     Result receive() override;
     Sent send(const AVPacket* packet) override;
     void flush() override;

@@ -129,18 +129,24 @@ std::int32_t FileDecoder::describeAsDecoded()
     const auto frames = frameFormatOf(codec_->sourceBits(), decoded());
     if (!frames)
         return AudioHandle::kFormatNotSupported;
-    noteSpeakers();
+    SoundFacts facts{
+        .speakers = speakersOf(decoded()), .profile = codec_->profile(), .tracks = demuxer_.audioStreams()};
+    if (codec_->decodesDSD())
+        facts.bitstreamRate = static_cast<std::uint64_t>(decoded().sample_rate) * 8;
     const AVCodecParameters& parameters = *demuxer_.stream().codecpar;
     const StreamDescription file =
         fileFormatOf(parameters, codec_->sourceBits(), frames->sampleRate, frames->channelsPerFrame);
     if (numbers_ == Numbers::byTime && decoded().sample_rate != parameters.sample_rate)
         numbers_ = Numbers::byCount;
     const bool isLayerII = parameters.codec_id == AV_CODEC_ID_MP2 && std::string_view(demuxer_.name()) == "mp3";
-    const FourCC fileType = isLayerII ? fourCC("MPG2") : fileTypeOf(demuxer_.name(), demuxer_.brand());
+    const FourCC fileType =
+        isLayerII ? fourCC("MPG2") : fileTypeOf(demuxer_.name(), demuxer_.brand(), parameters.codec_id);
     std::uint64_t count = 0;
     if (status = countFrames(count); status != kStatusOK)
         return status;
     limit_ = count;
+    facts.promisedFrames = promisedFrames(count, frames->sampleRate);
+    note(facts);
     if (status = restart(); status != kStatusOK)
         return status;
     describe(fileType, file, *frames, 0, count, DecodedFileHandle::unknownCount);
@@ -173,6 +179,25 @@ std::int32_t FileDecoder::countFrames(std::uint64_t& count)
     if (numbers_ == Numbers::byPosition && length < count && count - length < framesPerBlock_ + 8)
         count = length;
     return status;
+}
+
+/// By the file's header, of kinds that have the length there; 0 elsewhere, and where it is only rounded otherwise or
+/// counts what primes a decoder.
+std::uint64_t FileDecoder::promisedFrames(std::uint64_t count, double sampleRate) const
+{
+    constexpr std::array<std::string_view, 5> exact{"flac", "tta", "wv", "ape", "tak"};
+    constexpr std::array<std::string_view, 5> inexact{"mpc", "mpc8", "dsf", "iff", "mov,mp4,m4a,3gp,3g2,mj2"};
+    const AVStream& stream = demuxer_.stream();
+    const std::string_view name = demuxer_.name();
+    const auto rate = static_cast<int>(sampleRate);
+    // In Matroska the length is that of the longest stream.
+    const bool isInexact = isOneOf(name, inexact) || (name == "matroska,webm" && demuxer_.streams() == 1);
+    if ((!isOneOf(name, exact) && !isInexact) || stream.duration == AV_NOPTS_VALUE || stream.duration <= 0)
+        return 0;
+    const std::int64_t frames = av_rescale_q(stream.duration, stream.time_base, {1, rate});
+    const auto promised = static_cast<std::uint64_t>(std::max<std::int64_t>(frames, 0));
+    const auto tolerance = static_cast<std::uint64_t>(isInexact ? rate / 4 : 0);
+    return promised > count + tolerance ? promised : 0;
 }
 
 std::int32_t FileDecoder::countFromStart(std::uint64_t& count)

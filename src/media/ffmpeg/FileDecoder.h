@@ -27,6 +27,7 @@ private:
     FileDecoder(Demuxer demuxer, std::unique_ptr<CorrectionFile> corrections);
     std::int32_t begin();
     std::int32_t describeAsDecoded();
+    std::uint64_t promisedFrames(std::uint64_t count, double sampleRate) const;
     std::int32_t countFrames(std::uint64_t& count);
     std::int32_t countFromStart(std::uint64_t& count);
     std::int32_t decodeRest(std::uint64_t& end);

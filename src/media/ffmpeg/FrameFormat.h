@@ -18,7 +18,7 @@ StreamDescription nativePCM(double sampleRate, std::uint32_t channels, SampleFor
 /// many as the source has, `sourceBits` if that is known. Nothing when the decoder's samples are of no such kind.
 std::optional<StreamDescription> frameFormatOf(int sourceBits, const AVFrame& frame);
 
-/// As AudioDecoder::speakers().
+/// As SoundFacts::speakers.
 std::uint32_t speakersOf(const AVFrame& frame);
 
 /// Puts `count` frames from `first` on into `to`, in a format of frameFormatOf(). Where the frame has another number of

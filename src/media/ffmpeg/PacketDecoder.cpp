@@ -97,6 +97,7 @@ PacketDecoder::PacketDecoder(std::unique_ptr<PacketSource> source, CodecParamete
 std::int32_t PacketDecoder::describeAsDecoded()
 {
     StreamDescription file = source_->format();
+    SoundFacts facts = source_->facts();
     StreamDescription frames = nativePCM(file.sampleRate, file.channelsPerFrame, {.bits = 32, .isFloat = true});
     if (table_.validFrames > 0) { // else there is nothing to read, which is no fault
         Span span;
@@ -107,13 +108,14 @@ std::int32_t PacketDecoder::describeAsDecoded()
         const auto found = frameFormatOf(codec_->sourceBits(), decoded());
         if (!found)
             return AudioHandle::kFormatNotSupported;
-        noteSpeakers();
+        facts.speakers = speakersOf(decoded());
         frames = *found;
         if (static_cast<std::uint64_t>(decoded().nb_samples) > framesPerPacket_) // AAC of twice the rate that is stated
             return AudioHandle::kFormatNotSupported;
         frames.sampleRate = file.sampleRate;
         file.channelsPerFrame = frames.channelsPerFrame;
     }
+    note(facts);
     describe(source_->fileType(), file, frames, static_cast<std::uint64_t>(table_.primingFrames),
              static_cast<std::uint64_t>(table_.validFrames), source_->packetCount());
     return kStatusOK;

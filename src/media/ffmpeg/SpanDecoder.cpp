@@ -31,11 +31,6 @@ void SpanDecoder::compareChecksum()
         digest_.emplace(*stated_, frameFormat_, statedBits_);
 }
 
-void SpanDecoder::noteSpeakers()
-{
-    speakers_ = speakersOf(decoded());
-}
-
 std::int32_t SpanDecoder::seek(std::uint64_t frame)
 {
     frame_ = frame;

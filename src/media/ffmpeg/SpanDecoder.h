@@ -18,7 +18,7 @@ class SpanDecoder : public AudioDecoder {
 public:
     const StreamDescription& fileFormat() const override { return fileFormat_; }
     const StreamDescription& frameFormat() const override { return frameFormat_; }
-    std::uint32_t speakers() const override { return speakers_; }
+    SoundFacts facts() const override { return facts_; }
     std::uint64_t frameCount() const override { return frameCount_; }
     std::uint64_t missingFrames() const override { return missing_.count(); }
     ConvertingReader::Checksum checksum() const override
@@ -52,8 +52,8 @@ protected:
                   std::uint64_t first, std::uint64_t frameCount, std::uint64_t packetCount);
     /// What the file says of all its sound, samples of `bits` bits.
     void noteChecksum(const SoundDigest::Value& stated, std::uint32_t bits);
-    /// The frames in decoded() say which speakers the channels feed.
-    void noteSpeakers();
+    /// What the subclass knows beside that.
+    void note(const SoundFacts& facts) { facts_ = facts; }
     /// What is decoded is no longer there.
     void forget() { isLost_ = true; }
 
@@ -62,7 +62,7 @@ private:
 
     StreamDescription fileFormat_, frameFormat_;
     std::optional<DecodedFileHandle> handle_;
-    std::uint32_t speakers_ = 0;
+    SoundFacts facts_;
     std::uint64_t first_ = 0;
     std::uint64_t frameCount_ = 0;
     std::uint64_t frame_ = 0; // the one to be read next

@@ -18,6 +18,7 @@ public:
 
     const AVFrame& frame() const override;
     int sourceBits() const override;
+    bool decodesDSD() const override { return isDSD_; }
     Result receive() override;
     Sent send(const AVPacket* packet) override;
     void flush() override;

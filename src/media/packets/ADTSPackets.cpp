@@ -1,6 +1,5 @@
 #include "media/packets/ADTSPackets.h"
 
-#include "media/packets/AudioCookie.h"
 #include "media/packets/Codings.h"
 #include "media/packets/TagExtents.h"
 #include "platform/core/Packed.h"

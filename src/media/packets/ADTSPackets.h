@@ -1,6 +1,7 @@
 // The packets of AAC in an audio data transport stream (ADTS; ISO/IEC 13818-7, 6.2, and 14496-3, 1.A.2).
 #pragma once
 
+#include "media/packets/AudioCookie.h"
 #include "media/packets/FrameIndex.h"
 #include "media/packets/PacketSource.h"
 
@@ -20,6 +21,7 @@ public:
     BytesView cookie() const override { return cookie_; }
     const PacketTable& table() const override { return table_; }
     std::uint64_t packetCount() const override { return packetCount_; }
+    SoundFacts facts() const override { return factsOfCookie(format_); }
     std::uint64_t preRoll(std::uint64_t packet) override;
     std::int32_t read(std::uint64_t packet, Bytes& bytes) override;
 

@@ -128,6 +128,21 @@ std::int32_t readALACCookie(Bytes& cookie, StreamDescription& format)
     return isSound ? kStatusOK : kStatusIOError;
 }
 
+SoundFacts factsOfCookie(const StreamDescription& format)
+{
+    // By the number of channels. Of eight, AAC would have the inner pair of the front, 0xFF; its encoders mean the
+    // usual ones, and decoders take them for these.
+    constexpr std::array<std::uint32_t, 9> aac{0, 0x4, 0x3, 0x7, 0x107, 0x37, 0x3F, 0, 0x63F};
+    constexpr std::array<std::uint32_t, 9> alac{0, 0x4, 0x3, 0x7, 0x107, 0x37, 0x3F, 0x13F, 0xFF};
+    SoundFacts facts;
+    const bool isAAC = format.formatId == fourCC("aac ");
+    if ((isAAC || format.formatId == fourCC("alac")) && format.channelsPerFrame < aac.size())
+        facts.speakers = (isAAC ? aac : alac)[format.channelsPerFrame];
+    if (isAAC)
+        facts.profile = CodingProfile::aacLC; // else readAACCookie takes none
+    return facts;
+}
+
 std::uint32_t framesOfALACPacket(BytesView packet, std::uint32_t framesPerPacket)
 {
     enum : std::uint32_t { singleChannel = 0, channelPair = 1, lowFrequencies = 3 };

@@ -3,6 +3,7 @@
 // configuration of ALAC.
 #pragma once
 
+#include "media/samples/SoundFacts.h"
 #include "media/samples/StreamDescription.h"
 #include "platform/core/Bytes.h"
 
@@ -21,6 +22,10 @@ std::int32_t readAACCookie(Bytes& cookie, StreamDescription& format);
 std::int32_t readESDescriptor(Bytes& cookie, StreamDescription& format);
 /// kStatusIOError for a configuration that makes no sense.
 std::int32_t readALACCookie(Bytes& cookie, StreamDescription& format);
+
+/// What the configuration says beside the format: of AAC and ALAC a number of channels stands for its speakers. Nothing
+/// of other codings.
+SoundFacts factsOfCookie(const StreamDescription& format);
 
 /// The frames of a packet of ALAC: the last one of a file has fewer than the others, and says so.
 std::uint32_t framesOfALACPacket(BytesView packet, std::uint32_t framesPerPacket);

@@ -108,7 +108,10 @@ std::int32_t CAFPackets::readPackets(const ContainerLayout& layout, const AudioD
         if (const std::int32_t status = readSizes(start, layout.bodyOf(*chunk) + chunk->size, count);
             status != kStatusOK)
             return status;
-        index_.cut(index_.countFitting(0, index_.count(), audio.byteCount));
+        const std::uint64_t there = index_.countFitting(0, index_.count(), audio.byteCount);
+        if (there < count)
+            facts_.promisedFrames = std::min(valid, count * format_.framesPerPacket);
+        index_.cut(there);
     }
     index_.addRun(0, audio.dataOffset);
     const std::uint64_t frames = index_.count() * format_.framesPerPacket;
@@ -152,6 +155,9 @@ std::int32_t CAFPackets::readSizes(std::uint64_t position, std::uint64_t end, st
 std::int32_t CAFPackets::checkCoding()
 {
     const FourCC id = format_.formatId;
+    const SoundFacts stated = factsOfCookie(format_);
+    facts_.speakers = stated.speakers;
+    facts_.profile = stated.profile;
     if (id != fourCC("alac"))
         format_.bitsPerChannel = 0;
     if (id == fourCC("aac ") || id == fourCC("alac") || isOpaqueCoding(id))
@@ -169,6 +175,8 @@ std::int32_t CAFPackets::checkCoding()
             return status;
     if (first.size() >= MPEGFrameHeader::size)
         mpeg_ = MPEGFrameHeader::parse(first.data());
+    if (mpeg_)
+        facts_.speakers = mpeg_->speakers();
     const bool agrees = mpeg_ && mpeg_->sampleRate == format_.sampleRate &&
                         mpeg_->channels == format_.channelsPerFrame &&
                         mpeg_->framesPerPacket() == format_.framesPerPacket;

@@ -26,6 +26,7 @@ public:
     BytesView cookie() const override { return cookie_; }
     const PacketTable& table() const override { return table_; }
     std::uint64_t packetCount() const override { return index_.count(); }
+    SoundFacts facts() const override { return facts_; }
     std::uint64_t preRoll(std::uint64_t packet) override;
     std::int32_t read(std::uint64_t packet, Bytes& bytes) override;
 
@@ -43,6 +44,7 @@ private:
     Bytes cookie_;
     PacketIndex index_;
     PacketTable table_;
+    SoundFacts facts_;
 };
 
 } // namespace platform

@@ -91,12 +91,15 @@ std::int32_t M4APackets::readMovie()
 
 std::int32_t M4APackets::findTrack(const MP4Box& movie, Track& track)
 {
+    facts_.tracks = 0;
     MP4Boxes boxes(*file_, movie);
     while (const auto box = boxes.find(fourCC("trak"))) {
         const auto media = MP4Boxes(*file_, *box).find(fourCC("mdia"));
         const auto handler = media ? MP4Boxes(*file_, *media).find(fourCC("hdlr")) : std::nullopt;
         const BytesView kind = handler && handler->size() >= 12 ? file_->at(handler->body + 8, 4) : BytesView{};
         if (kind.size() < 4 || loadBE<FourCC>(kind.data()) != fourCC("soun"))
+            continue;
+        if (++facts_.tracks > 1)
             continue;
         const auto information = MP4Boxes(*file_, *media).find(fourCC("minf"));
         const auto samples = information ? MP4Boxes(*file_, *information).find(fourCC("stbl")) : std::nullopt;
@@ -105,9 +108,8 @@ std::int32_t M4APackets::findTrack(const MP4Box& movie, Track& track)
             return kStatusIOError;
         track.box = *box;
         track.samples = *samples;
-        return kStatusOK;
     }
-    return AudioHandle::kFormatNotSupported;
+    return facts_.tracks > 0 ? kStatusOK : AudioHandle::kFormatNotSupported;
 }
 
 /// Fills format and cookie from the first entry of "stsd".
@@ -167,7 +169,19 @@ std::int32_t M4APackets::makeTable(const MP4Box& movie, const Track& track)
     frames.gapless = readGaplessItem(*file_, movie);
     if (const std::int32_t status = readEditList(*file_, track.box, frames.edit); status != kStatusOK)
         return status;
-    return makePacketTable(frames, table_);
+    if (const std::int32_t status = makePacketTable(frames, table_); status != kStatusOK)
+        return status;
+    const SoundFacts stated = factsOfCookie(format_);
+    facts_.speakers = stated.speakers;
+    facts_.profile = stated.profile;
+    if (samples_.packets.count() < samples_.statedPackets) {
+        frames.inPackets = frames.inListed;
+        frames.stated = std::min(samples_.statedDuration(), frames.inListed);
+        PacketTable promised;
+        if (makePacketTable(frames, promised) == kStatusOK)
+            facts_.promisedFrames = static_cast<std::uint64_t>(promised.validFrames);
+    }
+    return kStatusOK;
 }
 
 std::uint64_t M4APackets::preRoll(std::uint64_t packet)

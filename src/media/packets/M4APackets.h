@@ -22,6 +22,7 @@ public:
     BytesView cookie() const override { return cookie_; }
     const PacketTable& table() const override { return table_; }
     std::uint64_t packetCount() const override { return samples_.packets.count(); }
+    SoundFacts facts() const override { return facts_; }
     std::uint64_t preRoll(std::uint64_t packet) override;
     std::int32_t read(std::uint64_t packet, Bytes& bytes) override;
 
@@ -40,6 +41,7 @@ private:
     Bytes cookie_;
     SampleTable samples_;
     PacketTable table_;
+    SoundFacts facts_;
 };
 
 } // namespace platform

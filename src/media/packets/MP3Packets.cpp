@@ -120,7 +120,7 @@ std::unique_ptr<PacketSource> MP3Packets::open(std::unique_ptr<PacketFile>& file
     status = packets->countPackets(start, end);
     if (status != kStatusOK)
         return nullptr;
-    packets->makeTable(start.info.value_or(MP3Info{}));
+    packets->makeTable(start.info.value_or(MP3Info{}), end - start.position);
     return packets;
 }
 
@@ -144,6 +144,7 @@ MP3Packets::MP3Packets(std::unique_ptr<PacketFile> file, const Start& start, std
     format_.sampleRate = first_.sampleRate;
     format_.channelsPerFrame = first_.channels;
     format_.framesPerPacket = first_.framesPerPacket();
+    facts_.speakers = first_.speakers();
 }
 
 /// The header's count is taken when its bytes are those that are there and could be so many frames.
@@ -161,7 +162,8 @@ std::int32_t MP3Packets::countPackets(const Start& start, std::uint64_t end)
     return index_.count(packetCount_);
 }
 
-void MP3Packets::makeTable(const MP3Info& info)
+/// `byteCount` are the bytes from the first frame on.
+void MP3Packets::makeTable(const MP3Info& info, std::uint64_t byteCount)
 {
     const auto frames = static_cast<std::int64_t>(packetCount_ * format_.framesPerPacket);
     if (info.padding) {
@@ -172,6 +174,12 @@ void MP3Packets::makeTable(const MP3Info& info)
         table_.remainderFrames = isWhole ? std::max<std::int32_t>(0, padding - std::int32_t{kDecoderDelay}) : 0;
     }
     table_.validFrames = std::max<std::int64_t>(0, frames - table_.primingFrames - table_.remainderFrames);
+    // Some writers count the frame that says so, too: bytes that are all there tell.
+    if (info.frameCount && *info.frameCount > packetCount_ && byteCount < info.byteCount.value_or(UINT32_MAX)) {
+        const std::uint64_t promised = std::uint64_t{*info.frameCount} * format_.framesPerPacket;
+        const std::uint64_t padding = info.padding ? std::uint64_t{info.padding->delay} + info.padding->padding : 0;
+        facts_.promisedFrames = promised - std::min(padding, promised);
+    }
 }
 
 std::uint64_t MP3Packets::preRoll(std::uint64_t packet)

@@ -20,6 +20,7 @@ public:
     BytesView cookie() const override { return {}; }
     const PacketTable& table() const override { return table_; }
     std::uint64_t packetCount() const override { return packetCount_; }
+    SoundFacts facts() const override { return facts_; }
     std::uint64_t preRoll(std::uint64_t packet) override;
     std::int32_t read(std::uint64_t packet, Bytes& bytes) override;
 
@@ -29,13 +30,14 @@ private:
     static MPEGFrameHeader firstOfSound(PacketFile& file, const Start& start);
     MP3Packets(std::unique_ptr<PacketFile> file, const Start& start, std::uint64_t end);
     std::int32_t countPackets(const Start& start, std::uint64_t end);
-    void makeTable(const MP3Info& info);
+    void makeTable(const MP3Info& info, std::uint64_t byteCount);
 
     std::unique_ptr<PacketFile> file_;
     MPEGFrameHeader first_;
     FrameIndex index_;
     StreamDescription format_;
     PacketTable table_;
+    SoundFacts facts_;
     std::uint64_t packetCount_ = 0;
 };
 

@@ -27,6 +27,8 @@ struct MPEGFrameHeader {
     {
         return version == other.version && sampleRate == other.sampleRate && channels == other.channels;
     }
+    /// As SoundFacts::speakers.
+    std::uint32_t speakers() const { return channels == 1 ? 0x4 : 0x3; }
     bool isMPEG1() const { return version == Version::mpeg1; }
     std::uint32_t framesPerPacket() const { return isMPEG1() ? 1152 : 576; }
     std::uint32_t sideInfoSize() const { return isMPEG1() ? (channels == 1 ? 17 : 32) : (channels == 1 ? 9 : 17); }

@@ -4,6 +4,7 @@
 
 #include "media/containers/AudioHandle.h"
 #include "media/packets/PacketTable.h"
+#include "media/samples/SoundFacts.h"
 #include "media/samples/StreamDescription.h"
 #include "platform/core/Bytes.h"
 
@@ -36,6 +37,8 @@ public:
     virtual BytesView cookie() const = 0;
     virtual const PacketTable& table() const = 0;
     virtual std::uint64_t packetCount() const = 0;
+    /// What the headers say; which speakers there are as the usual decoders have them.
+    virtual SoundFacts facts() const = 0;
     /// Packets to decode and drop ahead of one, so that it decodes as in a run from the first; never more than
     /// `packet`.
     virtual std::uint64_t preRoll(std::uint64_t packet) = 0;

@@ -209,8 +209,12 @@ private:
 
 std::uint64_t SampleTable::totalDuration() const
 {
-    const std::uint64_t whole = packets.count() * duration;
-    return packets.count() == statedPackets && statedPackets > 0 ? whole - (duration - lastDuration) : whole;
+    return packets.count() == statedPackets ? statedDuration() : packets.count() * duration;
+}
+
+std::uint64_t SampleTable::statedDuration() const
+{
+    return statedPackets > 0 ? statedPackets * duration - (duration - lastDuration) : 0;
 }
 
 std::int32_t SampleTable::read(PacketFile& file, const MP4Box& box, SampleTable& table)

@@ -17,6 +17,8 @@ struct SampleTable {
 
     /// Of the packets that are there.
     std::uint64_t totalDuration() const;
+    /// Of those that the tables list.
+    std::uint64_t statedDuration() const;
 
     /// From the box "stbl". kFormatNotSupported when packets differ in duration or the stream changes its coding,
     /// kStatusIOError when the tables contradict each other.

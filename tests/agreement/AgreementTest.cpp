@@ -12,6 +12,7 @@
 
 #include <algorithm>
 #include <random>
+#include <tuple>
 
 namespace {
 
@@ -209,6 +210,54 @@ TEST_F(Agreement, OnHeadersThatAreOdd)
                                        caf(flags, packet, bits, id).chunk("data", sound).bytes());
     for (const auto& [what, content] : files)
         expectAgreement(content, what);
+}
+
+TEST_F(Agreement, OnMP3WhoseFirstFramesMislead)
+{
+    folder_.write("IN.wav", source(48000, 2, 16));
+    ASSERT_TRUE(runs(folder_, "lame --quiet -t -b 128 IN.wav bare.mp3 && lame --quiet -b 128 IN.wav told.mp3"));
+    constexpr std::size_t frame = 384; // bytes of one
+    const Bytes bare = readFile(folder_ / "bare.mp3"), told = readFile(folder_ / "told.mp3");
+    const auto join = [](Bytes ahead, std::size_t padding, const Bytes& file) {
+        ahead.resize(ahead.size() + padding);
+        ahead.insert(ahead.end(), file.begin(), file.end());
+        return ahead;
+    };
+    const auto flip = [](Bytes file, std::size_t at, unsigned bits) {
+        file[at] ^= static_cast<std::byte>(bits);
+        return file;
+    };
+    const Bytes other{std::byte{0xFF}, std::byte{0xFB}, std::byte{0x90}, std::byte{0x64}}; // 44.1 kHz, 417 bytes
+    const Bytes same(bare.begin(), bare.begin() + 4);
+    const std::int64_t all = static_cast<std::int64_t>(bare.size() / frame) * 1152, lessOne = all - 1152;
+    const std::int64_t sound = 12000; // where the frame that says so is understood
+    const std::pair<const char*, std::pair<Bytes, std::int64_t>> files[] = {
+        {"a header of another stream ahead", {join(other, 100, bare), all}},
+        {"a header of the stream ahead", {join(same, 100, bare), all}},
+        {"two frames of another stream ahead", {join(join(other, 413, other), 50, bare), all}},
+        {"a header ahead of a frame that tells", {join(other, 100, told), sound}},
+        {"no sync", {flip(bare, 0, 0xFF), lessOne}},
+        {"another version", {flip(bare, 1, 0x08), lessOne}},
+        {"another layer", {flip(bare, 1, 0x06), lessOne}},
+        {"another bit rate", {flip(bare, 2, 0x10), lessOne}},
+        {"another sample rate", {flip(bare, 2, 0x0C), lessOne}},
+        {"cut ahead", {Bytes(bare.begin() + 100, bare.end()), lessOne}},
+        {"zeros over the start", {join({}, 300, Bytes(bare.begin() + 300, bare.end())), lessOne}},
+        {"another sample rate where it tells", {flip(told, 2, 0x0C), all}},
+        {"another version where it tells", {flip(told, 1, 0x08), all}},
+        {"another sample rate behind what it tells", {flip(told, frame + 2, 0x0C), sound}},
+        {"other channels behind what it tells", {flip(told, frame + 3, 0xC0), sound}},
+    };
+    for (const auto& [what, file] : files) {
+        expectAgreement(file.first, what);
+        const Answer answer = describedFile(folder_ / "file");
+        EXPECT_EQ(std::pair(answer.frames, answer.rate), std::pair(file.second, 48000.0)) << what;
+        std::ignore = folder_.write("file.mp3", file.first);
+        // Which drops up to two frames where it finds its way again.
+        const std::string judge = "mpg123 -q -w OUT.wav file.mp3; lost=$((" + std::to_string(file.second) +
+                                  " - $(soxi -s OUT.wav))); test $lost -ge 0 -a $lost -lt 3456";
+        EXPECT_TRUE(runs(folder_, judge)) << what << ", by mpg123";
+    }
 }
 
 struct Encoding {

@@ -64,48 +64,88 @@ std::uint64_t endOfZeros(PacketFile& file, std::uint64_t position)
     return position;
 }
 
+struct Run {
+    std::uint64_t position = 0;
+    MPEGFrameHeader header;
+};
+
+/// The first run of frames between two places that is long enough to be believed.
+std::optional<Run> findRun(PacketFile& file, std::uint64_t position, std::uint64_t limit)
+{
+    constexpr std::size_t kPiece = PacketFile::kMostAtOnce / 2;
+    for (; position < limit; ++position) {
+        BytesView bytes = file.at(position, kPiece);
+        if (bytes.empty())
+            break;
+        const void* sync = std::memchr(bytes.data(), 0xFF, bytes.size());
+        if (sync == nullptr) {
+            position += bytes.size() - 1;
+            continue;
+        }
+        position += static_cast<std::size_t>(static_cast<const std::byte*>(sync) - bytes.data());
+        bytes = file.at(position, kPiece);
+        if (const auto header = headerOfRun(bytes, kRunBehindJunk, position + bytes.size() == file.length()))
+            return Run{position, *header};
+    }
+    return {};
+}
+
 } // namespace
 
 struct MP3Packets::Start {
     std::uint64_t position = 0;
     std::optional<MPEGFrameHeader> header; // none: the file is no MP3
     std::optional<MP3Info> info;
+    std::optional<MPEGFrameHeader> sound; // of the frames of sound
 
     std::uint64_t soundPosition() const { return position + (info ? header->frameSize : 0); }
 };
 
-MP3Packets::Start MP3Packets::findStart(PacketFile& file)
+/// The frame at `position`, when it says what the others are, or `run` frames of a stream begin there.
+MP3Packets::Start MP3Packets::startAt(PacketFile& file, std::uint64_t position, int run)
 {
     Start start;
+    start.position = position;
+    const BytesView bytes = file.at(position, PacketFile::kMostAtOnce);
+    if (bytes.size() < FrameIndex::kHeaderSize)
+        return start;
+    start.header = MPEGFrameHeader::parse(bytes.data());
+    if (start.header)
+        start.info =
+            MP3Info::parse(*start.header, bytes.first(std::min<std::size_t>(bytes.size(), start.header->frameSize)));
+    if (!start.info)
+        start.header = headerOfRun(bytes, run, position + bytes.size() == file.length());
+    start.sound = start.header;
+    return start;
+}
+
+/// A header at the start may be chance, and the one of a damaged frame says what is not so: it is believed when frames
+/// that belong with it follow, else the frames that do follow each other decide.
+MP3Packets::Start MP3Packets::findStart(PacketFile& file)
+{
     const std::uint64_t tagEnd = endOfLeadingTags(file);
     if (isContainer(file.at(tagEnd, 8)))
-        return start;
-    start.position = endOfZeros(file, tagEnd);
-    BytesView bytes = file.at(start.position, PacketFile::kMostAtOnce);
-    const auto reachesEnd = [&](std::uint64_t position) { return position + bytes.size() == file.length(); };
-    if (bytes.size() >= FrameIndex::kHeaderSize) {
-        start.header = MPEGFrameHeader::parse(bytes.data());
-        if (start.header)
-            start.info = MP3Info::parse(*start.header,
-                                        bytes.first(std::min<std::size_t>(bytes.size(), start.header->frameSize)));
-        if (!start.info)
-            start.header = headerOfRun(bytes, kRunAtStart, reachesEnd(start.position));
+        return {};
+    Start start = startAt(file, endOfZeros(file, tagEnd), kRunAtStart);
+    if (start.header) {
+        // Writers of the frame ahead of the sound may take other channels for it.
+        const BytesView bytes = file.at(start.soundPosition(), PacketFile::kMostAtOnce);
+        const bool reachesEnd = start.soundPosition() + bytes.size() == file.length();
+        const auto sound = headerOfRun(bytes, start.info ? kRunAtStart : kRunBehindJunk, reachesEnd);
+        if (sound) {
+            start.sound = sound;
+            return start;
+        }
+        if (start.info && bytes.size() >= MPEGFrameHeader::size)
+            start.sound = MPEGFrameHeader::parse(bytes.data());
     }
-    // Else the first frame is looked for a little further on.
-    for (const std::uint64_t limit = start.position + kMostJunkAhead; !start.header && start.position < limit;) {
-        bytes = file.at(++start.position, PacketFile::kMostAtOnce / 2);
-        const void* sync = bytes.empty() ? nullptr : std::memchr(bytes.data(), 0xFF, bytes.size());
-        if (sync == nullptr && (bytes.empty() || reachesEnd(start.position)))
-            break;
-        const std::size_t skipped = sync == nullptr
-                                        ? bytes.size() - 1
-                                        : static_cast<std::size_t>(static_cast<const std::byte*>(sync) - bytes.data());
-        start.position += skipped;
-        bytes = file.at(start.position, PacketFile::kMostAtOnce / 2);
-        start.header = headerOfRun(bytes, kRunBehindJunk, reachesEnd(start.position));
-        if (start.header)
-            start.info = MP3Info::parse(*start.header, bytes.first(start.header->frameSize));
-    }
+    const auto run = findRun(file, start.position + 1, start.position + kMostJunkAhead);
+    if (run && start.header && run->header.belongsWith(*start.header))
+        start.sound = start.header;
+    else if (run)
+        start = startAt(file, run->position, kRunBehindJunk);
+    if (start.header && !start.sound)
+        start.sound = start.header;
     return start;
 }
 
@@ -124,17 +164,9 @@ std::unique_ptr<PacketSource> MP3Packets::open(std::unique_ptr<PacketFile>& file
     return packets;
 }
 
-/// The header of the first frame that is sound. Writers of the frame ahead of it may take other channels for that.
-MPEGFrameHeader MP3Packets::firstOfSound(PacketFile& file, const Start& start)
-{
-    const BytesView bytes = file.at(start.soundPosition(), MPEGFrameHeader::size);
-    const auto header = bytes.size() < MPEGFrameHeader::size ? std::nullopt : MPEGFrameHeader::parse(bytes.data());
-    return header.value_or(*start.header);
-}
-
 MP3Packets::MP3Packets(std::unique_ptr<PacketFile> file, const Start& start, std::uint64_t end)
     : file_(std::move(file)),
-      first_(firstOfSound(*file_, start)),
+      first_(*start.sound),
       index_(*file_, start.soundPosition(), end, [first = first_](const std::byte* bytes) -> std::uint32_t {
           const auto header = MPEGFrameHeader::parse(bytes);
           return header && header->belongsWith(first) ? header->frameSize : 0;

@@ -8,8 +8,8 @@
 
 namespace platform {
 
-/// The first frame of sound decides on version, sample rate and channels; frames of another kind are passed over like
-/// any other bytes that are none. A packet is a whole frame, its header included.
+/// The first frame of sound that others follow decides on version, sample rate and channels; frames of another kind are
+/// passed over like any other bytes that are none. A packet is a whole frame, its header included.
 class MP3Packets final : public PacketSource {
 public:
     /// Null, with `status` kFormatNotSupported when the file is no MP3. `file` is taken over when it is.
@@ -27,7 +27,7 @@ public:
 private:
     struct Start; // of the frames, and what the first says
     static Start findStart(PacketFile& file);
-    static MPEGFrameHeader firstOfSound(PacketFile& file, const Start& start);
+    static Start startAt(PacketFile& file, std::uint64_t position, int run);
     MP3Packets(std::unique_ptr<PacketFile> file, const Start& start, std::uint64_t end);
     std::int32_t countPackets(const Start& start, std::uint64_t end);
     void makeTable(const MP3Info& info, std::uint64_t byteCount);

@@ -253,9 +253,9 @@ TEST_F(Agreement, OnMP3WhoseFirstFramesMislead)
         const Answer answer = describedFile(folder_ / "file");
         EXPECT_EQ(std::pair(answer.frames, answer.rate), std::pair(file.second, 48000.0)) << what;
         std::ignore = folder_.write("file.mp3", file.first);
-        // Which drops up to two frames where it finds its way again.
+        // Which drops a frame or two where it finds its way again, or plays what stands around the sound.
         const std::string judge = "mpg123 -q -w OUT.wav file.mp3; lost=$((" + std::to_string(file.second) +
-                                  " - $(soxi -s OUT.wav))); test $lost -ge 0 -a $lost -lt 3456";
+                                  " - $(soxi -s OUT.wav))); test $lost -gt -3456 -a $lost -lt 3456";
         EXPECT_TRUE(runs(folder_, judge)) << what << ", by mpg123";
     }
 }

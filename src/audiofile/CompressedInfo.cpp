@@ -21,7 +21,8 @@ void setCompressed(AudioFileInfo& info, FourCC fileType, const platform::StreamD
     info.compressed = true;
     info.formatCode = format.formatId;
     info.bitsPerSample = 0;
-    info.sourceBits = static_cast<std::int32_t>(std::min<std::uint32_t>(format.bitsPerChannel, 64));
+    const bool isLossy = format.bytesPerPacket > 0 && !format.isLinearPCM(); // whose bits are those of its codes
+    info.sourceBits = isLossy ? 0 : static_cast<std::int32_t>(std::min<std::uint32_t>(format.bitsPerChannel, 64));
     info.channels = static_cast<std::int32_t>(std::min<std::uint32_t>(format.channelsPerFrame, 0xFFFF));
     info.busFormat = AudioBusFormatForChannels(info.channels);
     SetSampleRate(info, format.sampleRate);

@@ -47,6 +47,9 @@ class Info(CommandTest):
         tag = b"ID3\x03\0\0\0\0\0\x0a" + bytes(10)
         self.write("tagged.wav", tag + wave())
         self.assertEqual(self.lines("info", "tagged.wav"), ["tagged.wav\tWAVE\t0.002083\t48000\t16-bit\t1"])
+        # A known kind that nothing here decodes is told by its name.
+        self.write("a.aac", b"ADIF" + bytes(range(200)))
+        self.assertEqual(self.failure("info", "a.aac"), "ktfiles: a.aac: AAC in ADIF: no audio that can be decoded\n")
         # What the library finds by itself needs no module; for the rest the message names what does.
         plain = self.without_decoders()
         for name in ("a.mp3", "a.m4a", "a.flac"):

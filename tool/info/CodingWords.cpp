@@ -46,6 +46,20 @@ constexpr Word containers[] = {
     {fourCC("iff "), "IFF"},
     {fourCC("voc "), "VOC"},
     {fourCC("amrf"), "AMR"},
+    {fourCC("adif"), "AAC in ADIF"},
+    {fourCC("sox "), "SoX"},
+    {fourCC("irca"), "IRCAM"},
+    {fourCC("pvf "), "PVF"},
+    {fourCC("epaf"), "PAF"},
+    {fourCC("avr "), "AVR"},
+    {fourCC("sds "), "SDS"},
+    {fourCC("wve "), "WVE"},
+    {fourCC("adx "), "ADX"},
+    {fourCC("nut "), "NUT"},
+    {fourCC("mxf "), "MXF"},
+    {fourCC("oma "), "OMA"},
+    {fourCC("qcp "), "QCP"},
+    {fourCC("rm  "), "RealMedia"},
     {fourCC("MPGT"), "MPEG-TS"},
     {fourCC("mpeg"), "MPEG-PS"},
     {fourCC("AVI "), "AVI"},
@@ -77,6 +91,7 @@ constexpr Word codings[] = {
     {tagged(0x160), "WMA 1"},        {tagged(0x161), "WMA 2"},     {tagged(0x162), "WMA Pro"},
     {tagged(0x163), "WMA Lossless"}, {tagged(0x2000), "AC-3"},     {tagged(0x2001), "DTS"},
     {tagged(0xF1AC), "FLAC"},        {fourCC("dsd_"), "DSD"},      {fourCC("dst "), "DST"},
+    {fourCC("adx "), "ADX ADPCM"},
 };
 
 using platform::CodingProfile;
@@ -123,7 +138,7 @@ std::string containerWord(const AudioFileInfo& info)
     if (info.containerId == kFORM)
         return fourCCText(info.formType);
     const char* const word = find(containers, info.containerId);
-    return word != nullptr ? word : fourCCText(info.containerId);
+    return word != nullptr ? word : trimmed(info.containerId);
 }
 
 std::string codingWord(const AudioFileInfo& info)

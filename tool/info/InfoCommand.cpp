@@ -14,6 +14,18 @@
 
 namespace {
 
+/// Of a file that is known, but not decoded here.
+void failAsDecoderDoes(const std::string& path, const std::string& kind)
+{
+    CAudioFileIO audio;
+    openAudio(audio, path);
+    try {
+        requireDecoder(audio);
+    } catch (const Failure& failure) {
+        throw Failure(kind + ": " + failure.what());
+    }
+}
+
 AudioFileInfo describe(const std::string& path, bool quiet)
 {
     const FileAccess access = accessForReading(path, {.quiet = quiet});
@@ -23,11 +35,8 @@ AudioFileInfo describe(const std::string& path, bool quiet)
     const std::int32_t status = GetAudioFileInfo(file, 0, info);
     if (file.GetEOF() == 0)
         throw Failure("is empty");
-    if (status == platform::AudioHandle::kFormatNotSupported) {
-        CAudioFileIO audio;
-        openAudio(audio, path);
-        requireDecoder(audio); // knows why
-    }
+    if (status == platform::AudioHandle::kFormatNotSupported)
+        failAsDecoderDoes(path, containerWord(info));
     if (status == kStatusEndOfFile)
         throw Failure("ends within its header");
     if (status == kStatusParameterError || (status == kStatusOK && info.containerId == 0))

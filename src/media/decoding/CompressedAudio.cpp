@@ -63,6 +63,24 @@ constexpr Beginning kBeginnings[] = {
      {"\xFF\xFF\xE0\xD0", 4}}, // a packet that begins a table, not scrambled
     {0, {"\x00\x00\x01\xBA", 4}, fourCC("mpeg")},
     {0, ".RMF", fourCC("rm  ")},
+    {0, ".SoX", fourCC("sox ")},
+    {0, "XoS.", fourCC("sox ")},
+    {0, {"\x64\xA3\x00\x00", 4}, fourCC("irca"), {"\xFF\xFF\xF8\xFF", 4}}, // of four machines, in both orders
+    {0, {"\x00\x00\xA3\x64", 4}, fourCC("irca"), {"\xFF\xF8\xFF\xFF", 4}},
+    {0, "PVF1", fourCC("pvf ")},
+    {0, " paf", fourCC("epaf")},
+    {0, "fap ", fourCC("epaf")},
+    {0, "2BIT", fourCC("avr ")},
+    {0, {"\xF0\x7E\x00\x01", 4}, fourCC("sds "), {"\xFF\xFF\x80\xFF", 4}}, // whatever the channel
+    {0, "ALawSoundFile", fourCC("wve ")},
+    {0, {"\x80\x00\x00\x00\x03\x12\x04", 7}, fourCC("adx "), {"\xFF\xFF\x00\x00\xFF\xFF\xFF", 7}},
+    {0, "nut/multimedia", fourCC("nut ")},
+    {0, {"\x06\x0E\x2B\x34\x02\x05\x01\x01", 8}, fourCC("mxf ")},
+    {0, "ea3\x03", fourCC("oma ")},
+    {0, {"EA3\x01\x00", 5}, fourCC("oma ")},
+    {0, "ADIF", fourCC("adif")},
+    {8, "QLCM", fourCC("qcp ")},
+    {8, "MAUD", fourCC("iff ")},
     {8, "WAVE", fourCC("WAVE")}, // behind a tag
     {8, "AVI ", fourCC("AVI ")},
     {8, "XWMA", fourCC("xwma")},

@@ -46,6 +46,7 @@ constexpr Coding codings[] = {
     {AV_CODEC_ID_ADPCM_MS, fourCC('m', 's', 0, 2)},
     {AV_CODEC_ID_GSM_MS, fourCC('m', 's', 0, 0x31)},
     {AV_CODEC_ID_ADPCM_IMA_WAV, fourCC('m', 's', 0, 0x11)},
+    {AV_CODEC_ID_ADPCM_ADX, fourCC("adx ")},
     {AV_CODEC_ID_WMAV1, fourCC('m', 's', 1, 0x60)},
     {AV_CODEC_ID_WMAV2, fourCC('m', 's', 1, 0x61)},
     {AV_CODEC_ID_WMAPRO, fourCC('m', 's', 1, 0x62)},
@@ -113,8 +114,9 @@ void setLinearPCM(StreamDescription& format, AVCodecID codec)
 } // namespace
 
 const char* const usedDemuxers =
-    "3dostr,aa,aac,ac3,act,adx,aea,afc,aiff,alaw,amr,amrnb,amrwb,ape,apc,asf,ast,au,avi,bfstm,brstm,caf,dsf,dts,dtshd,"
-    "eac3,"
+    "3dostr,aa,aac,ac3,act,adx,aea,afc,aiff,alaw,amr,amrnb,amrwb,ape,apc,asf,ast,au,avi,avr,bfstm,brstm,caf,dsf,dts,"
+    "dtshd,"
+    "eac3,epaf,"
     "flac,flv,g722,gsm,gxf,hca,iff,ircam,iss,lvf,loas,matroska,mlp,mov,mp3,mpc,mpc8,mpeg,mpegts,mxf,nistsphere,nsv,nut,"
     "nuv,"
     "ogg,oma,paf,pvf,qcp,rm,roq,rso,sds,shn,smk,sox,swf,tak,tta,truehd,txd,voc,vqf,w64,wav,wsaud,wtv,wv,wve,xa,xwma";

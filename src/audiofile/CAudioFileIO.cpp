@@ -51,18 +51,33 @@ CAudioFileIO::~CAudioFileIO()
 
 std::int32_t CAudioFileIO::Open(const CFileRef& ref, unsigned int permission)
 {
+    const std::int32_t status = OpenUndescribed(ref, permission);
+    if (status == kStatusOK)
+        Describe(permission);
+    return status;
+}
+
+std::int32_t CAudioFileIO::OpenForChunks(const CFileRef& ref, unsigned int permission)
+{
+    const std::int32_t status = OpenUndescribed(ref, permission);
+    if (status == kStatusOK && HasChunks())
+        Describe(permission);
+    else if (status == kStatusOK)
+        mInfoStatus = kStatusParameterError;
+    return status;
+}
+
+std::int32_t CAudioFileIO::OpenUndescribed(const CFileRef& ref, unsigned int permission)
+{
     if (&ref == this) {
         const CFileRef copy(ref); // closing resets the base
-        return Open(copy, permission);
+        return OpenUndescribed(copy, permission);
     }
     Close();
     const bool createsWhatIsMissing = (permission & (kFileIOReadWrite | kFileIOMemory)) == kFileIOReadWrite;
     if (createsWhatIsMissing && !isWritableTarget(ref))
         return kStatusFileNotFound;
-    const std::int32_t status = CFileIO::Open(ref, permission);
-    if (status == kStatusOK)
-        Describe(permission);
-    return status;
+    return CFileIO::Open(ref, permission);
 }
 
 /// A file that is no audio file is open all the same, and described as far as it was understood.

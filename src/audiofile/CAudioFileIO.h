@@ -47,6 +47,9 @@ public:
     void Init() override;
     /// The status of the base open; kStatusFileNotFound for write access to what is missing or a directory.
     std::int32_t Open(const CFileRef& ref, unsigned int permission) override;
+    /// As Open, but describes the file only when it has chunks (HasChunks), so that no decoder is ever loaded for one
+    /// that has none: that is open, too, and InfoStatus() is kStatusParameterError.
+    std::int32_t OpenForChunks(const CFileRef& ref, unsigned int permission);
     std::int32_t Close() override;
     /// Creates (or empties) a file, writes its header for no frames and opens it for writing. `cacheSize` is the read
     /// cache in KiB; `channels` of 0 stands for those of the bus format; `headerOption` as in BuildAudioFileHeader.
@@ -186,6 +189,8 @@ private:
     void ForgetFile();
     std::int32_t ReadBytes(void* to, const FoundChunk& found);
     std::int32_t ReadBody(const FoundChunk& found, std::unique_ptr<char[]>& data);
+    std::int32_t OpenUndescribed(const CFileRef& ref, unsigned int permission);
+    bool BeginsAsCAF();
     void Describe(unsigned int permission);
 
     AudioFileInfo mInfo;

@@ -41,7 +41,13 @@ FourCC CAudioFileIO::IsChunkBased()
 
 bool CAudioFileIO::HasChunks()
 {
-    return IsOpen() && (mInfo.fileType == kCaff || IsChunkBased() != 0);
+    return IsOpen() && (mInfo.fileType == kCaff || BeginsAsCAF() || IsChunkBased() != 0);
+}
+
+bool CAudioFileIO::BeginsAsCAF()
+{
+    std::array<std::byte, 8> start; // id, version and flags
+    return Read(start.data(), 0, start.size(), nullptr) == kStatusOK && loadBE<FourCC>(start.data()) == kCaff;
 }
 
 std::int32_t CAudioFileIO::ReadExtendedFileHeader(ContainerChkExtended& header)

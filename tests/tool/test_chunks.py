@@ -4,7 +4,7 @@ import struct
 import subprocess
 import unittest
 
-from command import INSTRUMENTED, KTFILES, CommandTest, caf, chunk, wave
+from command import INSTRUMENTED, KTFILES, CommandTest, caf, chunk, needs_decoders, wave
 
 
 class List(CommandTest):
@@ -29,6 +29,20 @@ class List(CommandTest):
         self.assertEqual(self.lines("chunks", "b.wav", "c.aiff")[0], "b.wav\tds64\t12\t28")
         several = self.json("chunks", "a.wav", "missing", "d.caf", status=1)
         self.assertEqual([item.get("error", item["path"]) for item in several], ["a.wav", "file not found", "d.caf"])
+
+    @needs_decoders
+    def test_what_has_no_chunks_loads_no_decoder(self):
+        def loaded(*arguments):
+            result = subprocess.run([KTFILES, *arguments], capture_output=True, cwd=self.folder, text=True,
+                                    env={**os.environ, "LD_DEBUG": "files"})
+            return "libktfiles-decoders" in result.stderr, result.returncode
+        for name, options in (("a.ogg", ()), ("a.mka", ()), ("low.aac", ("-ar", "22050"))):
+            self.encoded(name, *options, seconds=0.2)
+            for arguments in (["chunks", name], ["chunks", "get", name, "fmt"], ["chunks", "remove", name, "note"], ["adm", name],
+                              ["chunks", "remove", name, "note", "--sidecar", "xyz"]):
+                with self.subTest(arguments):
+                    self.assertEqual(loaded(*arguments), (False, 1))
+        self.assertEqual(loaded("info", "a.ogg"), (True, 0))  # or nothing would be seen
 
     def test_what_is_no_container(self):
         self.write("text.wav", b"no audio file at all")

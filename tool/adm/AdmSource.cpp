@@ -49,7 +49,7 @@ bool looksLikeXml(std::string_view head)
 
 AdmSource::AdmSource(const std::string& path)
 {
-    requireOK(file_.Open(referenceTo(path), 0));
+    requireOK(file_.OpenForChunks(referenceTo(path), 0));
     const std::int64_t length = file_.GetEOF();
     if (length == 0)
         throw Failure("is empty");

@@ -134,7 +134,7 @@ void addSidecarOption(Verb& verb, std::string& extension)
 bool keepsItsChunks(const std::string& path)
 {
     CAudioFileIO file;
-    requireOK(file.Open(referenceTo(path), 0));
+    requireOK(file.OpenForChunks(referenceTo(path), 0));
     return file.HasChunks();
 }
 

@@ -54,7 +54,7 @@ void requireDecoder(CAudioFileIO& file)
 
 void openContainer(CAudioFileIO& file, const std::string& path, unsigned int mode)
 {
-    requireOK(file.Open(referenceTo(path), mode));
+    requireOK(file.OpenForChunks(referenceTo(path), mode));
     if (file.GetEOF() == 0)
         throw Failure("is empty");
     if (!file.HasChunks())

@@ -17,6 +17,9 @@ struct FileStatus {
     FileKind kind = FileKind::other;
     std::uint32_t permissions = 0; // the low 12 mode bits
     std::int64_t changed = 0;      // when content or attributes changed last, in nanoseconds since 1970
+    std::uint64_t links = 0;       // names that the item has
+
+    bool isSameItem(const FileStatus& other) const { return device == other.device && inode == other.inode; }
 };
 
 enum class OpenFor { reading, readingAndWriting };
@@ -58,6 +61,32 @@ struct SystemCalls {
     int (*exchangeNames)(const char* a, const char* b);
     int (*removeFile)(const char* path);
     int (*removeFolder)(const char* path); // an empty one
+    /// A second name; EEXIST when something has it.
+    int (*linkFile)(const char* path, const char* name);
+
+    // Names in a folder that is open, wherever its path leads meanwhile. A symbolic link is the item itself.
+    /// A folder that may be written but not read serves too; fsync fails with EBADF then.
+    int (*openFolder)(const char* path);
+    /// O_CREAT | O_EXCL, for reading and writing.
+    int (*createFileIn)(int folder, const char* name, std::uint32_t permissions);
+    /// For reading and writing, without waiting. What else than a regular file has the name is opened too.
+    int (*openFileIn)(int folder, const char* name);
+    bool (*statusIn)(int folder, const char* name, FileStatus* status);
+    int (*removeFileIn)(int folder, const char* name);
+    /// In the place of what has the name `to`.
+    int (*renameIn)(int folder, const char* from, const char* to);
+    /// EEXIST when something has the name `to`, in one step wherever the file system has such a step.
+    int (*renameInWithoutReplacing)(int folder, const char* from, const char* to);
+
+    // Copies of an open file.
+    /// Makes the content of `to` that of `from` without copying it; fails where the file system cannot.
+    int (*shareContent)(int from, int to);
+    /// Copies inside the system, from one offset of both files on; the bytes copied, 0 at the end of `from`. Fails
+    /// where the system cannot.
+    std::int64_t (*copyRange)(int from, int to, std::int64_t offset, std::size_t count);
+    /// The next bytes from `offset` on that are no hole, as [begin, end); false with ENXIO when only a hole is left.
+    bool (*nextData)(int descriptor, std::int64_t offset, std::int64_t* begin, std::int64_t* end);
+    int (*setOwner)(int descriptor, std::uint32_t owner, std::uint32_t group);
 };
 
 /// The calls in force in this process. Only tests assign to it.

@@ -39,6 +39,14 @@ enum class Call {
     renameWithoutReplacing,
     exchangeNames,
     removeFile,
+    linkFile,
+    openFolder,
+    createFileIn,
+    renameIn,
+    renameInWithoutReplacing,
+    shareContent,
+    copyRange,
+    setOwner,
     count
 };
 
@@ -60,6 +68,15 @@ public:
         calls.renameWithoutReplacing = intercept<Call::renameWithoutReplacing, &SystemCalls::renameWithoutReplacing>;
         calls.exchangeNames = intercept<Call::exchangeNames, &SystemCalls::exchangeNames>;
         calls.removeFile = intercept<Call::removeFile, &SystemCalls::removeFile>;
+        calls.linkFile = intercept<Call::linkFile, &SystemCalls::linkFile>;
+        calls.openFolder = intercept<Call::openFolder, &SystemCalls::openFolder>;
+        calls.createFileIn = intercept<Call::createFileIn, &SystemCalls::createFileIn>;
+        calls.renameIn = intercept<Call::renameIn, &SystemCalls::renameIn>;
+        calls.renameInWithoutReplacing =
+            intercept<Call::renameInWithoutReplacing, &SystemCalls::renameInWithoutReplacing>;
+        calls.shareContent = intercept<Call::shareContent, &SystemCalls::shareContent>;
+        calls.copyRange = intercept<Call::copyRange, &SystemCalls::copyRange>;
+        calls.setOwner = intercept<Call::setOwner, &SystemCalls::setOwner>;
         calls.pread = transfer<Call::pread, &SystemCalls::pread>;
         calls.pwrite = transfer<Call::pwrite, &SystemCalls::pwrite>;
         // Like the system's, a close that fails has closed.
@@ -104,8 +121,8 @@ private:
         errno = plan.error;
         return true;
     }
-    template <Call call, auto entry, class... Arguments>
-    static int intercept(Arguments... arguments)
+    template <Call call, auto entry, class Result, class... Arguments>
+    static Result intercept(Arguments... arguments)
     {
         return hit(call) ? failed() : (real().*entry)(arguments...);
     }

@@ -1,8 +1,10 @@
 // ktfiles chunks add, and remove.
+#include "audiofile/ContainerChanges.h"
+#include "platform/OwnedDescriptor.h"
 #include "tool/chunks/ChunksCommand.h"
-#include "tool/chunks/ContainerChanges.h"
 #include "tool/chunks/SidecarChunks.h"
 #include "tool/shared/arguments/CommandLine.h"
+#include "tool/shared/edits/EditProblems.h"
 #include "tool/shared/input/InputFile.h"
 #include "tool/shared/output/Failure.h"
 #include "tool/shared/output/JsonWriter.h"
@@ -29,7 +31,7 @@ Bytes readAll(const std::string& from)
     const bool standardInput = from.empty() || from == "-";
     if (from.empty() && isTerminal(STDIN_FILENO))
         throw UsageError("name the chunk's content with --from IN, or type it after --from -");
-    const Descriptor opened(standardInput ? -1 : ::open(from.c_str(), O_RDONLY | O_NOCTTY | O_CLOEXEC));
+    const platform::OwnedDescriptor opened(standardInput ? -1 : ::open(from.c_str(), O_RDONLY | O_NOCTTY | O_CLOEXEC));
     const int descriptor = standardInput ? STDIN_FILENO : opened.get();
     const std::string name = standardInput ? "standard input" : from;
     constexpr std::size_t kStep = 1 << 20;
@@ -120,7 +122,7 @@ EditReport addToContainer(const EditArguments& arguments, const Bytes& body)
     const EditScope scope = scopeOf(arguments, objection);
     if (!arguments.options.dryRun)
         report.backup = edit.apply(scope, [&](const std::string& path) {
-            addChunkTo(path, {arguments.id, body, arguments.replace, arguments.force});
+            requireNone(AddChunkTo(referenceTo(path), {arguments.id, body, arguments.replace, arguments.force}));
         });
     return report;
 }
@@ -134,8 +136,9 @@ EditReport removeFromContainer(const EditArguments& arguments)
     const EditScope scope = scopeOf(arguments, objectionToRemoving(found, arguments.id));
     EditReport report{"remove", found.count, found.total};
     if (!arguments.options.dryRun)
-        report.backup =
-            edit.apply(scope, [&](const std::string& path) { removeChunksFrom(path, arguments.id, found.count); });
+        report.backup = edit.apply(scope, [&](const std::string& path) {
+            requireNone(RemoveChunksFrom(referenceTo(path), arguments.id, found.count));
+        });
     return report;
 }
 

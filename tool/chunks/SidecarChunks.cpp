@@ -1,10 +1,11 @@
 #include "tool/chunks/SidecarChunks.h"
 
 #include "audiofile/BusFormats.h"
-#include "tool/chunks/ContainerChanges.h"
+#include "audiofile/ContainerChanges.h"
+#include "files/CTemporaryFile.h"
 #include "tool/shared/arguments/CommandLine.h"
-#include "tool/shared/edits/FileCopy.h"
-#include "tool/shared/edits/TemporaryFile.h"
+#include "tool/shared/edits/EditProblems.h"
+#include "tool/shared/edits/EndingSignals.h"
 #include "tool/shared/input/InputFile.h"
 #include "tool/shared/output/Failure.h"
 
@@ -112,7 +113,7 @@ void makeMetadata(const std::string& path, FourCC id, const Bytes& body)
     CAudioFileIO file;
     requireOK(file.CreateAndOpenCommon(referenceTo(path), 0, kAudioBusMono, 0, 16, 44100, kAIFF, true));
     requireOK(file.Close());
-    addChunkTo(path, {id, body, false, false});
+    requireNone(AddChunkTo(referenceTo(path), {id, body}));
 }
 
 [[noreturn]] void failToChange(const std::string& sidecar, const Failure& failure)
@@ -214,7 +215,7 @@ void Sidecars::addToMetadata(FourCC id, const Bytes& body, bool force)
         return;
     if (isWhole)
         edit.apply(objection ? EditScope::wholeFile() : EditScope::chunk(id), [&](const std::string& path) {
-            addChunkTo(path, {id, body, true, force});
+            requireNone(AddChunkTo(referenceTo(path), {id, body, true, force}));
         });
     else
         edit.apply(EditScope::wholeFile(), [&](const std::string& path) { makeMetadata(path, id, body); });
@@ -228,19 +229,21 @@ bool Sidecars::createMetadata(FourCC id, const Bytes& body)
     struct stat sound = {};
     if (::stat(file_.c_str(), &sound) != 0)
         throw Failure(systemErrorText(errno));
-    TemporaryFile made(metadata_);
-    makeMetadata(made.path(), id, body);
+    removeTemporaryFilesAtEndingSignals();
+    CTemporaryFile made;
+    requireNone(made.Create(metadata_));
+    makeMetadata(made.Path(), id, body);
     // Whoever may read the one may read the other; the owner where that can be had.
-    if (::fchown(made.descriptor(), sound.st_uid, sound.st_gid) != 0 && errno != EPERM)
+    if (::fchown(made.Descriptor(), sound.st_uid, sound.st_gid) != 0 && errno != EPERM)
         throw Failure(systemErrorText(errno));
-    if (::fchmod(made.descriptor(), sound.st_mode & 0666) != 0)
+    if (::fchmod(made.Descriptor(), sound.st_mode & 0666) != 0)
         throw Failure(systemErrorText(errno));
-    synchronize(made.descriptor());
-    if (!made.publish(metadata_))
+    requireNone(made.Commit());
+    const FileProblem problem = made.Publish(metadata_);
+    if (problem.kind == FileProblem::Kind::system && problem.systemError == EEXIST)
         return false;
-    if (!made.synchronizeFolder())
-        throw Failure("is edited, but a loss of power now may undo that: its folder cannot be committed to storage: " +
-                      systemErrorText(errno));
+    requireNone(problem);
+    requireNone(made.CommitFolder());
     return true;
 }
 
@@ -271,7 +274,7 @@ void Sidecars::removeRaw()
         accessForWriting(raw_, platform::FileCoordinator::WritingOptions::none, options_.waiting());
     if (::unlink(raw_.c_str()) != 0 && errno != ENOENT)
         throw Failure(raw_ + ": " + systemErrorText(errno));
-    synchronizeFolderOf(raw_.c_str());
+    synchronizeFolderOf(raw_);
 }
 
 SidecarRemoval Sidecars::remove(FourCC id)
@@ -284,8 +287,9 @@ SidecarRemoval Sidecars::remove(FourCC id)
         if (removal.count > 0) {
             removal.where = metadata_;
             if (!options_.dryRun)
-                edit.apply(EditScope::chunk(id),
-                           [&](const std::string& path) { removeChunksFrom(path, id, removal.count); });
+                edit.apply(EditScope::chunk(id), [&](const std::string& path) {
+                    requireNone(RemoveChunksFrom(referenceTo(path), id, removal.count));
+                });
         }
     }
     if (isRegularFile(raw_)) {

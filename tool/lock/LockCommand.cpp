@@ -2,8 +2,8 @@
 #include "coordination/KTFileCoordinationLock.h"
 #include "coordination/KTFilePresenterLock.h"
 #include "platform/Log.h"
+#include "platform/OwnedDescriptor.h"
 #include "tool/lock/ChildProcess.h"
-#include "tool/shared/access/Descriptor.h"
 #include "tool/shared/access/FileAccess.h"
 #include "tool/shared/access/Parties.h"
 #include "tool/shared/arguments/CommandLine.h"
@@ -174,7 +174,7 @@ int lockAndRun(const LockArguments& arguments, const OutputOptions& options)
         throw Failure(fmt::format("is locked by process {} already, which waits for this command; nothing was run",
                                   lock->processID));
     // Nothing is read from it: `ktfiles locks` knows items by number alone, and finds the name of this one here.
-    const Descriptor shown(::open(arguments.file.c_str(), O_PATH | O_CLOEXEC));
+    const platform::OwnedDescriptor shown(::open(arguments.file.c_str(), O_PATH | O_CLOEXEC));
     Holder holder(arguments, url);
     awaitLock(holder, arguments, url, options.quiet);
     if (!arguments.command.empty()) {

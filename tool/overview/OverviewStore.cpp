@@ -1,8 +1,9 @@
 #include "tool/overview/OverviewStore.h"
 
+#include "audiofile/ContainerChanges.h"
 #include "audiofile/ContainerHeaders.h"
 #include "loops/overview/StoredOverview.h"
-#include "tool/shared/edits/EditGuards.h"
+#include "tool/shared/edits/EditProblems.h"
 #include "tool/shared/input/InputFile.h"
 #include "tool/shared/output/Failure.h"
 
@@ -51,12 +52,7 @@ void refuseObjections(const std::string& path, const FileOverview& overview)
 
 void write(const std::string& path, FileOverview& overview, bool kept)
 {
-    {
-        CAudioFileIO file;
-        openContainer(file, path, kFileIOReadWrite);
-        requireOK(file.PrepareToAppend()); // an open-ended chunk "data" has its size then
-        requireOK(file.Close());
-    }
+    requireNone(SettleContainerEnd(referenceTo(path)));
     errno = 0;
     bool stored = false;
     const std::int32_t status = WriteOverviewToAudioFile(referenceTo(path), &overview.block(), 0, &stored);

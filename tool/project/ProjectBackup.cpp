@@ -1,10 +1,11 @@
 #include "tool/project/ProjectBackup.h"
 
+#include "files/FileCopy.h"
+#include "platform/OwnedDescriptor.h"
 #include "tool/project/ProjectEdit.h"
 #include "tool/project/ProjectPackage.h"
 #include "tool/project/UnfinishedBackup.h"
-#include "tool/shared/access/Descriptor.h"
-#include "tool/shared/edits/FileCopy.h"
+#include "tool/shared/edits/EditProblems.h"
 #include "tool/shared/output/Failure.h"
 #include "tool/shared/output/Progress.h"
 
@@ -35,35 +36,35 @@ void requireNoEnd()
 }
 
 /// Everything but an owner that this user may not give away.
-void keepAttributes(int from, struct stat status, int to)
+void keepAttributes(int from, platform::FileAttributes attributes, int to)
 {
-    struct stat own = {};
-    if (::fstat(to, &own) != 0)
+    platform::FileAttributes own;
+    if (!platform::fileAttributes(to, own))
         failWithErrno();
-    if (::geteuid() != 0 && (own.st_uid != status.st_uid || own.st_gid != status.st_gid)) {
-        status.st_uid = own.st_uid;
-        status.st_gid = own.st_gid;
-        status.st_mode &= ~static_cast<mode_t>(S_ISUID | S_ISGID);
+    if (::geteuid() != 0 && (own.owner != attributes.owner || own.group != attributes.group)) {
+        attributes.owner = own.owner;
+        attributes.group = own.group;
+        attributes.permissions &= ~std::uint32_t{S_ISUID | S_ISGID};
     }
-    copyAttributes(from, status, to);
+    requireNone(CopyFileAttributes(from, attributes, to));
     synchronize(to);
 }
 
 /// A link is followed: what it leads to is what the backup is for.
 void copyFile(const fs::path& from, const fs::path& to, bool quiet)
 {
-    const Descriptor source(::open(from.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK));
+    const platform::OwnedDescriptor source(::open(from.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK));
     struct stat status = {};
-    if (!source || ::fstat(source.get(), &status) != 0)
+    platform::FileAttributes attributes;
+    if (!source || ::fstat(source.get(), &status) != 0 || !platform::fileAttributes(source.get(), attributes))
         failWithErrno();
     if (!S_ISREG(status.st_mode))
         throw Failure(from.filename().string() + " is no regular file");
-    const Descriptor target(::open(to.c_str(), O_RDWR | O_CREAT | O_EXCL | O_CLOEXEC, 0600));
+    const platform::OwnedDescriptor target(::open(to.c_str(), O_RDWR | O_CREAT | O_EXCL | O_CLOEXEC, 0600));
     if (!target)
         failWithErrno();
-    Progress progress(from.filename().string(), status.st_size, quiet);
-    copyContent(source.get(), target.get(), progress);
-    keepAttributes(source.get(), status, target.get());
+    requireNone(CopyFileContent(source.get(), target.get(), copyProgress(from.filename().string(), quiet)));
+    keepAttributes(source.get(), attributes, target.get());
     requireNoEnd();
 }
 
@@ -73,16 +74,16 @@ void copyItem(const fs::path& from, const fs::path& to, bool quiet);
 // NOLINTNEXTLINE(misc-no-recursion): no deeper than the folders are
 void copyFolder(const fs::path& from, const fs::path& to, bool quiet)
 {
-    const Descriptor source(::open(from.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
-    struct stat status = {};
-    if (!source || ::fstat(source.get(), &status) != 0 || ::mkdir(to.c_str(), 0700) != 0)
+    const platform::OwnedDescriptor source(::open(from.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
+    platform::FileAttributes attributes;
+    if (!source || !platform::fileAttributes(source.get(), attributes) || ::mkdir(to.c_str(), 0700) != 0)
         failWithErrno();
     for (const fs::directory_entry& entry : fs::directory_iterator(from))
         copyItem(entry.path(), to / entry.path().filename(), quiet);
-    const Descriptor target(::open(to.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
+    const platform::OwnedDescriptor target(::open(to.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
     if (!target)
         failWithErrno();
-    keepAttributes(source.get(), status, target.get());
+    keepAttributes(source.get(), attributes, target.get());
 }
 
 // NOLINTNEXTLINE(misc-no-recursion)

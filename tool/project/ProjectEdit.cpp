@@ -1,15 +1,17 @@
 #include "tool/project/ProjectEdit.h"
 
+#include "platform/SignalHold.h"
 #include "tool/project/ProjectPackage.h"
 #include "tool/shared/access/FileAccess.h"
-#include "tool/shared/edits/TemporaryFile.h"
+
+#include <csignal>
 
 void editProject(const std::string& package, const WaitOptions& wait,
                  const std::function<void(const std::string& package)>& edit)
 {
     const std::string resolved = resolvedFolder(package);
     const FileAccess access = accessForWriting(resolved, platform::FileCoordinator::WritingOptions::none, wait);
-    const SignalHold hold;
+    const platform::SignalHold hold;
     edit(resolved);
 }
 

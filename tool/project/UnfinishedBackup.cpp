@@ -1,7 +1,7 @@
 #include "tool/project/UnfinishedBackup.h"
 
 #include "platform/Folders.h"
-#include "tool/shared/edits/FileCopy.h"
+#include "tool/shared/edits/EditProblems.h"
 #include "tool/shared/output/Failure.h"
 
 #include <fmt/format.h>
@@ -21,10 +21,10 @@ constexpr const char* kPrefix = ".ktfiles-backup";
 constexpr int kMostAttempts = 100;
 
 /// Locked for this process; false when another has it, or it is no folder.
-Descriptor lockedFolder(const fs::path& path)
+platform::OwnedDescriptor lockedFolder(const fs::path& path)
 {
-    Descriptor folder(::open(path.c_str(), O_RDONLY | O_DIRECTORY | O_NOFOLLOW | O_CLOEXEC));
-    return folder && ::flock(folder.get(), LOCK_EX | LOCK_NB) == 0 ? std::move(folder) : Descriptor();
+    platform::OwnedDescriptor folder(::open(path.c_str(), O_RDONLY | O_DIRECTORY | O_NOFOLLOW | O_CLOEXEC));
+    return folder && ::flock(folder.get(), LOCK_EX | LOCK_NB) == 0 ? std::move(folder) : platform::OwnedDescriptor();
 }
 
 void removeAbandoned(const fs::path& backups)
@@ -32,7 +32,7 @@ void removeAbandoned(const fs::path& backups)
     std::error_code error;
     for (fs::directory_iterator entry(backups, error), end; !error && entry != end; entry.increment(error))
         if (entry->path().filename().string().starts_with(kPrefix))
-            if (const Descriptor lock = lockedFolder(entry->path()))
+            if (const platform::OwnedDescriptor lock = lockedFolder(entry->path()))
                 platform::removeTree(entry->path().string());
 }
 
@@ -79,6 +79,6 @@ bool UnfinishedBackup::publish(const fs::path& name)
         throw Failure(systemErrorText(errno));
     }
     path_.clear();
-    synchronizeFolderOf(name.c_str());
+    synchronizeFolderOf(name.string());
     return true;
 }

@@ -1,7 +1,7 @@
 // The folder in which a backup is made, until it is whole and takes its name.
 #pragma once
 
-#include "tool/shared/access/Descriptor.h"
+#include "platform/OwnedDescriptor.h"
 
 #include <filesystem>
 
@@ -22,5 +22,5 @@ public:
 
 private:
     std::filesystem::path path_; // empty once it is published
-    Descriptor lock_;
+    platform::OwnedDescriptor lock_;
 };

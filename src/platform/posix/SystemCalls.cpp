@@ -10,7 +10,9 @@
 #include <string_view>
 
 #include <fcntl.h>
+#include <linux/fs.h>
 #include <linux/openat2.h>
+#include <sys/ioctl.h>
 #include <sys/stat.h>
 #include <sys/syscall.h>
 #include <unistd.h>
@@ -51,6 +53,7 @@ FileStatus fileStatus(const struct stat& from)
                                           : FileKind::other;
     status.permissions = from.st_mode & 07777;
     status.changed = std::int64_t{from.st_ctim.tv_sec} * 1'000'000'000 + from.st_ctim.tv_nsec;
+    status.links = from.st_nlink;
     return status;
 }
 
@@ -235,6 +238,83 @@ int exchangeNames(const char* a, const char* b)
     return ::renameat2(AT_FDCWD, a, AT_FDCWD, b, RENAME_EXCHANGE);
 }
 
+int openFolder(const char* path)
+{
+    const int descriptor = ::open(path, O_RDONLY | O_DIRECTORY | O_CLOEXEC);
+    return descriptor >= 0 ? descriptor : ::open(path, O_PATH | O_DIRECTORY | O_CLOEXEC);
+}
+
+int createFileIn(int folder, const char* name, std::uint32_t permissions)
+{
+    return ::openat(folder, name, O_RDWR | O_CREAT | O_EXCL | O_NOFOLLOW | O_CLOEXEC | O_NOCTTY,
+                    static_cast<mode_t>(permissions));
+}
+
+int openFileIn(int folder, const char* name)
+{
+    return ::openat(folder, name, O_RDWR | O_NOFOLLOW | O_NONBLOCK | O_CLOEXEC | O_NOCTTY);
+}
+
+bool statusIn(int folder, const char* name, FileStatus* status)
+{
+    struct stat found = {};
+    if (::fstatat(folder, name, &found, AT_SYMLINK_NOFOLLOW) != 0)
+        return false;
+    *status = fileStatus(found);
+    return true;
+}
+
+int removeFileIn(int folder, const char* name)
+{
+    return ::unlinkat(folder, name, 0);
+}
+
+int renameIn(int folder, const char* from, const char* to)
+{
+    return ::renameat(folder, from, folder, to);
+}
+
+int renameInWithoutReplacing(int folder, const char* from, const char* to)
+{
+    if (::renameat2(folder, from, folder, to, RENAME_NOREPLACE) == 0)
+        return 0;
+    // A file system without that flag: a second name, then the first goes.
+    if (errno == EEXIST || ::linkat(folder, from, folder, to, 0) != 0)
+        return -1;
+    ::unlinkat(folder, from, 0);
+    return 0;
+}
+
+int shareContent(int from, int to)
+{
+    return ::ioctl(to, FICLONE, from);
+}
+
+std::int64_t copyRange(int from, int to, std::int64_t offset, std::size_t count)
+{
+    off_t read = offset, written = offset;
+    return ::copy_file_range(from, &read, to, &written, count, 0);
+}
+
+bool nextData(int descriptor, std::int64_t offset, std::int64_t* begin, std::int64_t* end)
+{
+    struct stat status = {};
+    if (::fstat(descriptor, &status) != 0)
+        return false;
+    const off_t data = ::lseek(descriptor, offset, SEEK_DATA);
+    if (data < 0 && errno == ENXIO)
+        return false;
+    *begin = data < 0 ? offset : data; // a file system that knows no holes
+    const off_t hole = data < 0 ? -1 : ::lseek(descriptor, data, SEEK_HOLE);
+    *end = hole < 0 ? status.st_size : std::min(hole, status.st_size);
+    return true;
+}
+
+int setOwner(int descriptor, std::uint32_t owner, std::uint32_t group)
+{
+    return ::fchown(descriptor, owner, group);
+}
+
 static_assert(sizeof(off_t) == 8, "file offsets are 64-bit");
 
 } // namespace
@@ -261,6 +341,18 @@ SystemCalls& systemCalls()
         .exchangeNames = exchangeNames,
         .removeFile = ::unlink,
         .removeFolder = ::rmdir,
+        .linkFile = ::link,
+        .openFolder = openFolder,
+        .createFileIn = createFileIn,
+        .openFileIn = openFileIn,
+        .statusIn = statusIn,
+        .removeFileIn = removeFileIn,
+        .renameIn = renameIn,
+        .renameInWithoutReplacing = renameInWithoutReplacing,
+        .shareContent = shareContent,
+        .copyRange = copyRange,
+        .nextData = nextData,
+        .setOwner = setOwner,
     };
     return calls;
 }

@@ -1,8 +1,10 @@
 #include "tool/shared/edits/OutputFile.h"
 
-#include "tool/shared/edits/FileCopy.h"
+#include "files/FileCopy.h"
+#include "platform/SystemCalls.h"
+#include "tool/shared/edits/EditProblems.h"
+#include "tool/shared/edits/EndingSignals.h"
 #include "tool/shared/output/Failure.h"
-#include "tool/shared/output/Progress.h"
 
 #include <algorithm>
 #include <cerrno>
@@ -45,7 +47,7 @@ OutputFile::OutputFile(const std::string& out, const std::string& source, Existi
         original.st_ino == found.st_ino)
         throw Failure("the output would be written over the file itself");
     if (exists && !S_ISREG(found.st_mode)) {
-        device_ = Descriptor(::open(out.c_str(), O_WRONLY | O_NOCTTY | O_CLOEXEC));
+        device_ = platform::OwnedDescriptor(::open(out.c_str(), O_WRONLY | O_NOCTTY | O_CLOEXEC));
         if (!device_)
             throw Failure(out + ": " + systemErrorText(errno));
         return;
@@ -60,13 +62,15 @@ OutputFile::OutputFile(const std::string& out, const std::string& source, Existi
     const mode_t mask = ::umask(0);
     ::umask(mask);
     mode_ = 0666 & ~mask;
-    file_.emplace(target_);
+    removeTemporaryFilesAtEndingSignals();
+    file_ = std::make_unique<CTemporaryFile>();
+    requireNone(file_->Create(target_));
 }
 
 void OutputFile::write(std::string_view bytes)
 {
     while (!bytes.empty()) {
-        const ssize_t written = ::write(file_ ? file_->descriptor() : device_.get(), bytes.data(), bytes.size());
+        const ssize_t written = ::write(file_ ? file_->Descriptor() : device_.get(), bytes.data(), bytes.size());
         if (written < 0 && errno != EINTR)
             failToWrite(errno);
         bytes.remove_prefix(static_cast<std::size_t>(std::max<ssize_t>(written, 0)));
@@ -76,7 +80,7 @@ void OutputFile::write(std::string_view bytes)
 void OutputFile::rewrite(std::int64_t offset, std::string_view bytes)
 {
     while (!bytes.empty()) {
-        const ssize_t written = ::pwrite(file_->descriptor(), bytes.data(), bytes.size(), offset);
+        const ssize_t written = ::pwrite(file_->Descriptor(), bytes.data(), bytes.size(), offset);
         if (written < 0 && errno != EINTR)
             failToWrite(errno);
         offset += std::max<ssize_t>(written, 0);
@@ -88,47 +92,60 @@ void OutputFile::finish()
 {
     if (!file_)
         return;
-    if (::fchmod(file_->descriptor(), mode_) != 0)
+    if (::fchmod(file_->Descriptor(), mode_) != 0)
         throw Failure(systemErrorText(errno));
-    synchronize(file_->descriptor());
-    if (const Descriptor replaced = replaced_.empty() ? Descriptor() : openRegularFile(replaced_, O_RDWR))
+    requireNone(file_->Commit());
+    if (const platform::OwnedDescriptor replaced = openReplaced())
         takePlaceOf(replaced);
     else if (existing_ == Existing::replace)
-        file_->replace();
-    else if (!file_->publish(target_)) // it came meanwhile
-        failSinceItExists(out_);
-    if (!file_->synchronizeFolder())
+        requireNone(file_->Replace());
+    else
+        publish();
+    if (const FileProblem problem = file_->CommitFolder())
         throw Failure("the output is written, but its folder cannot be committed to storage: " +
-                      systemErrorText(errno));
+                      systemErrorText(problem.systemError));
 }
 
-void OutputFile::takePlaceOf(const Descriptor& replaced)
+platform::OwnedDescriptor OutputFile::openReplaced() const
 {
-    struct stat status = {};
-    if (::fstat(replaced.get(), &status) != 0)
+    return platform::OwnedDescriptor(
+        replaced_.empty()
+            ? -1
+            : platform::systemCalls().openFile(replaced_.c_str(), platform::OpenFor::readingAndWriting, nullptr));
+}
+
+void OutputFile::publish()
+{
+    const FileProblem problem = file_->Publish(target_);
+    if (problem.kind == FileProblem::Kind::system && problem.systemError == EEXIST) // it came meanwhile
+        failSinceItExists(out_);
+    requireNone(problem);
+}
+
+void OutputFile::takePlaceOf(const platform::OwnedDescriptor& replaced)
+{
+    platform::FileStatus status;
+    platform::FileAttributes attributes;
+    if (!platform::systemCalls().status(replaced.get(), &status) ||
+        !platform::fileAttributes(replaced.get(), attributes))
         failToWrite(errno);
-    if (status.st_nlink > 1)
+    // Not in the place of one that has other names, or an owner that we cannot give it.
+    if (status.links > 1 || CopyFileAttributes(replaced.get(), attributes, file_->Descriptor(), KeptTimes::accessOnly))
         return writeInto(replaced);
-    try {
-        copyAttributes(replaced.get(), status, file_->descriptor(), Times::now);
-    } catch (const Failure&) { // an owner that we cannot give it
-        return writeInto(replaced);
-    }
-    file_->replace();
+    requireNone(file_->Replace());
 }
 
 // Room is made sure of while the old content is still there.
-void OutputFile::writeInto(const Descriptor& replaced)
+void OutputFile::writeInto(const platform::OwnedDescriptor& replaced)
 {
     struct stat status = {};
-    if (::fstat(file_->descriptor(), &status) != 0)
+    if (::fstat(file_->Descriptor(), &status) != 0)
         failToWrite(errno);
     if (::fallocate(replaced.get(), FALLOC_FL_KEEP_SIZE, 0, std::max<off_t>(status.st_size, 1)) != 0 && errno == ENOSPC)
         failToWrite(errno);
     if (::ftruncate(replaced.get(), 0) != 0)
         failToWrite(errno);
-    Progress progress("writing", status.st_size, true);
-    copyContent(file_->descriptor(), replaced.get(), progress);
+    requireNone(CopyFileContent(file_->Descriptor(), replaced.get()));
     synchronize(replaced.get());
 }
 

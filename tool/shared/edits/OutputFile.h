@@ -1,12 +1,12 @@
 // Results that the command writes to a file of the user's choice.
 #pragma once
 
-#include "tool/shared/access/Descriptor.h"
-#include "tool/shared/edits/TemporaryFile.h"
+#include "files/CTemporaryFile.h"
+#include "platform/OwnedDescriptor.h"
 
 #include <cstdint>
 #include <functional>
-#include <optional>
+#include <memory>
 #include <string>
 #include <string_view>
 #include <sys/stat.h>
@@ -27,10 +27,10 @@ public:
     void write(std::string_view bytes);
 
     /// Whether it can be gone back to, and be opened by its path until it is finished.
-    bool isRegular() const { return file_.has_value(); }
+    bool isRegular() const { return file_ != nullptr; }
     /// Of a regular file only.
     void rewrite(std::int64_t offset, std::string_view bytes);
-    std::string path() const { return file_->path(); }
+    std::string path() const { return file_->Path(); }
     /// The path of the regular file that it is going to replace; empty when there is none.
     const std::string& replaced() const { return replaced_; }
 
@@ -39,14 +39,16 @@ public:
     void finish();
 
 private:
-    void takePlaceOf(const Descriptor& replaced);
-    void writeInto(const Descriptor& replaced);
+    platform::OwnedDescriptor openReplaced() const;
+    void publish();
+    void takePlaceOf(const platform::OwnedDescriptor& replaced);
+    void writeInto(const platform::OwnedDescriptor& replaced);
 
     std::string out_, target_, replaced_; // as given, and with symbolic links resolved
     Existing existing_;
     mode_t mode_ = 0;
-    std::optional<TemporaryFile> file_;
-    Descriptor device_;
+    std::unique_ptr<CTemporaryFile> file_; // null: it is none
+    platform::OwnedDescriptor device_;
 };
 
 /// Throws the Failure of a file that an OutputFile would not replace: ahead of long work.

@@ -1,17 +1,13 @@
-// Edits that cannot leave a file half done: the change is made to a copy in the same folder, which then takes the
-// place of the original with its mode, owner and extended attributes.
+// Edits of files as the verbs make them: by a safe edit of the library, with coordinated access, in the command's
+// words.
 #pragma once
 
-#include "tool/shared/access/Descriptor.h"
+#include "audiofile/CContainerEdit.h"
 #include "tool/shared/access/FileAccess.h"
-#include "tool/shared/edits/EditScope.h"
 
 #include <functional>
 #include <optional>
 #include <string>
-#include <sys/stat.h>
-
-class TemporaryFile;
 
 /// The options that every edit takes.
 struct EditOptions {
@@ -34,7 +30,7 @@ public:
     SafeEdit(const std::string& path, const EditOptions& options);
 
     /// The file to be changed, symbolic links resolved: look at it here before `apply`.
-    const std::string& target() const { return target_; }
+    const std::string& target() const { return edit_.Target(); }
 
     /// Calls `change` with a path that leads to the file to change, and to no other whatever happens to its name. What
     /// is not in the scope is compared afterwards. When anything throws, the original is as it was, to the byte; with
@@ -43,25 +39,7 @@ public:
     std::string apply(const EditScope& scope, const std::function<void(const std::string& path)>& change);
 
 private:
-    using Change = std::function<void(const std::string&)>;
-
-    void open();
-    void waitForOthers();
-    bool isStillAtTarget() const;
-    void requireOneName() const;
-    bool isOwnBackup(const std::string& name) const;
-    std::string ownBackup() const;
-    void requireUntouched(bool isAtTarget) const;
-    std::string applyToCopy(const EditScope& scope, const Change& change);
-    std::string applyInPlace(const EditScope& scope, const Change& change);
-    void cutBack(const EditScope& scope) const;
-    void copyTo(TemporaryFile& copy) const;
-    std::string backupByLink() const;
-    std::string backupByCopy() const;
-
-    std::string target_;
     EditOptions options_;
     FileAccess access_;
-    Descriptor file_;
-    struct stat status_ = {}; // when the edit began
+    CContainerEdit edit_;
 };

@@ -1,6 +1,8 @@
 #include "tool/shared/input/InputFile.h"
 
+#include "audiofile/ContainerChanges.h"
 #include "platform/core/Status.h"
+#include "tool/shared/edits/EditProblems.h"
 #include "tool/shared/output/Failure.h"
 
 #include <cerrno>
@@ -54,9 +56,5 @@ void requireDecoder(CAudioFileIO& file)
 
 void openContainer(CAudioFileIO& file, const std::string& path, unsigned int mode)
 {
-    requireOK(file.OpenForChunks(referenceTo(path), mode));
-    if (file.GetEOF() == 0)
-        throw Failure("is empty");
-    if (!file.HasChunks())
-        throw Failure("no container known here (RIFF, RF64, BW64, AIFF, AIFC, REX2, CAF)");
+    requireNone(OpenContainer(file, referenceTo(path), mode));
 }

@@ -6,7 +6,10 @@
 
 #include <algorithm>
 #include <cstdio>
+#include <memory>
+#include <optional>
 #include <unistd.h>
+#include <utility>
 
 Progress::Progress(std::string label, std::int64_t total, bool quiet)
     : label_(std::move(label)),
@@ -41,4 +44,21 @@ void Progress::draw() const
     std::fputs(fmt::format("\r{} {:█<{}}{:░<{}} {:3.0f}%", label_, "", full, "", bar - full, part * 100).c_str(),
                stderr);
     std::fflush(stderr);
+}
+
+std::function<void(std::int64_t done, std::int64_t all)> copyProgress(std::string label, bool quiet)
+{
+    struct Copy {
+        std::optional<Progress> bar;
+        std::int64_t done = 0;
+    };
+    return [copy = std::make_shared<Copy>(), label = std::move(label), quiet](std::int64_t done, std::int64_t all) {
+        if (!copy->bar) {
+            copy->bar.emplace(label, all, quiet);
+            copy->done = 0;
+        }
+        copy->bar->advance(done - std::exchange(copy->done, done));
+        if (done == all)
+            copy->bar.reset();
+    };
 }

@@ -3,6 +3,7 @@
 
 #include <chrono>
 #include <cstdint>
+#include <functional>
 #include <string>
 
 /// Shows itself after a second, on a terminal only, and is gone when it is destroyed.
@@ -27,3 +28,6 @@ private:
     bool shown_ = false;
     Clock::time_point nextDraw_;
 };
+
+/// A bar for each copy that the library tells of, which is gone when the copy is made.
+std::function<void(std::int64_t done, std::int64_t all)> copyProgress(std::string label, bool quiet);

@@ -1,6 +1,7 @@
 // What an edit of a container is about. All else in the file must come through it to the byte.
 #pragma once
 
+#include "platform/core/Export.h"
 #include "platform/core/FourCC.h"
 
 #include <vector>
@@ -9,7 +10,7 @@ struct EditScope {
     /// Whether anything is compared at all.
     enum class Kind {
         chunks, // of a container
-        whole   // of a file that is no container, or of one that is damaged and edited by --force all the same
+        whole   // of a file that is no container, or of one that is damaged and edited all the same
     };
 
     Kind kind = Kind::chunks;
@@ -19,5 +20,5 @@ struct EditScope {
     static EditScope chunk(FourCC id) { return {Kind::chunks, {id}, false}; }
     static EditScope wholeFile() { return {Kind::whole, {}, false}; }
     /// Everything that loop tags are kept in, and the texts beside them.
-    static EditScope ofLoopTags();
+    KT_EXPORT static EditScope ofLoopTags();
 };

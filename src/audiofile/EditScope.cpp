@@ -1,4 +1,4 @@
-#include "tool/shared/edits/EditScope.h"
+#include "audiofile/EditScope.h"
 
 #include "loops/tagging/ChunkIDs.h"
 

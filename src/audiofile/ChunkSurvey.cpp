@@ -1,0 +1,61 @@
+#include "audiofile/ChunkSurvey.h"
+
+#include "media/containers/ChunkRole.h"
+
+#include <algorithm>
+
+namespace {
+
+// Whether it makes up the sound, or the way to it. A container has one of each.
+bool isStructural(FourCC container, FourCC id)
+{
+    using Kind = platform::ContainerKind;
+    const Kind kind = container == kFORM   ? Kind::iff
+                      : container == kCaff ? Kind::caf
+                      : container == kCAT  ? Kind::rex2
+                                           : Kind::riff;
+    return platform::roleOfChunk(kind, id) == platform::ChunkRole::essential;
+}
+
+} // namespace
+
+ContainerProblem SurveyChunks(CAudioFileIO& file, FourCC id, ChunkSurvey& survey)
+{
+    survey = {};
+    const auto visit = [&](const ChunkEntry& chunk) {
+        survey.last = chunk;
+        if (chunk.id != id)
+            return true;
+        ++survey.count;
+        survey.total += std::max<std::int64_t>(chunk.size, 0);
+        // An empty chunk of a CAF file is found only when there is no other.
+        if (survey.extent.id != kCaff || !survey.found || survey.found->size == 0)
+            survey.found = chunk;
+        return true;
+    };
+    return ContainerProblem::ofStatus(file.ForEachChunk(visit, &survey.extent), ContainerProblem::Kind::chunks);
+}
+
+std::int64_t ChunkBodyOffset(const ChunkEntry& chunk, const ContainerExtent& extent)
+{
+    return chunk.offset + static_cast<std::int64_t>(extent.id == kCaff ? sizeof(CAFChunkHeader) : sizeof(ChkHeader));
+}
+
+ContainerProblem ObjectToAdding(CAudioFileIO& file, const ChunkSurvey& survey, FourCC id, ChunkObjection& objection)
+{
+    objection = {};
+    if (survey.count > 0 && isStructural(survey.extent.id, id)) {
+        objection.kind = ChunkObjection::Kind::oneOnly;
+        return {};
+    }
+    const std::int32_t status = ExamineContainerTail(file, objection.tail);
+    if (status == kStatusOK && objection.tail.fault != ContainerTail::Fault::none)
+        objection.kind = ChunkObjection::Kind::tail;
+    return ContainerProblem::ofStatus(status, ContainerProblem::Kind::chunks);
+}
+
+ChunkObjection ObjectionToRemoving(const ChunkSurvey& survey, FourCC id)
+{
+    const bool isLost = survey.count > 0 && isStructural(survey.extent.id, id);
+    return {isLost ? ChunkObjection::Kind::soundLost : ChunkObjection::Kind::none, {}};
+}

@@ -10,9 +10,10 @@
 
 #include <gtest/gtest.h>
 
-#include <cstdio>
+#include <chrono>
 #include <set>
 #include <stdexcept>
+#include <thread>
 
 #include <fcntl.h>
 #include <sys/stat.h>
@@ -201,17 +202,20 @@ TEST_F(SafeEdit, BackupsAreNeverOverwritten)
 
 TEST_F(SafeEdit, WhatOthersDoMeanwhileStands)
 {
-    const std::pair<const char*, std::function<void()>> cases[] = {
-        {"played on", [&] { std::fclose(std::fopen(path.c_str(), "w")); }},
-        {"", [&] { fs::rename(folder.write("new", "another's"), path); }},
-        {"another's", [&] { fs::remove(path); }},
+    const std::string none = "no file";
+    const struct {
+        std::string after;
+        std::function<void()> act;
+    } cases[] = {
+        {"THE OLD CONTENT", [&] { folder.write("a", "THE OLD CONTENT"); }}, // as long as before
+        {"another's", [&] { fs::rename(folder.write("new", "another's"), path); }},
+        {none, [&] { fs::remove(path); }},
     };
-    EXPECT_EQ(edit(path, [&](const std::string&) { return folder.write("a", "played on"), kStatusOK; }).kind,
-              Kind::changed);
-    for (const auto& [before, act] : cases) {
-        EXPECT_EQ(textIn(path), before);
-        EXPECT_EQ(edit(path, [&, act = act](const std::string& copy) { return act(), writeNew(copy); }).kind,
-                  Kind::changed);
+    for (const auto& each : cases) {
+        std::this_thread::sleep_for(std::chrono::milliseconds(20)); // clocks of file systems are coarse
+        const auto change = [&](const std::string& copy) { return each.act(), writeNew(copy); };
+        EXPECT_EQ(edit(path, change).kind, Kind::changed);
+        EXPECT_EQ(fs::exists(path) ? textIn(path) : none, each.after);
     }
     EXPECT_TRUE(namesIn(folder.path()).empty());
 }

@@ -21,16 +21,6 @@ namespace {
 
 constexpr char kMetadataExtension[] = "ktmd";
 
-std::string resolved(const std::string& path)
-{
-    requireRegularFile(path);
-    std::error_code error;
-    const std::filesystem::path canonical = std::filesystem::canonical(path, error);
-    if (error)
-        throw Failure(systemErrorText(error.value()));
-    return canonical.string();
-}
-
 bool isRegularFile(const std::string& path)
 {
     struct stat status = {};
@@ -141,7 +131,7 @@ bool keepsItsChunks(const std::string& path)
 
 SidecarChunk readFromAnywhere(const std::string& path, FourCC id, const std::string& extension)
 {
-    const std::string file = resolved(path);
+    const std::string file = resolvedPath(path);
     const SidecarNames names(file, extension);
     if (isRegularFile(names.metadata) && !isTorn(names.metadata)) {
         if (!keepsItsChunks(names.metadata))
@@ -159,7 +149,7 @@ SidecarChunk readFromAnywhere(const std::string& path, FourCC id, const std::str
 }
 
 Sidecars::Sidecars(const std::string& path, const std::string& extension, const EditOptions& options)
-    : file_(resolved(path)),
+    : file_(resolvedPath(path)),
       options_(options)
 {
     const SidecarNames names(file_, extension);

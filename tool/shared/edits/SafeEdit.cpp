@@ -7,19 +7,7 @@
 #include "tool/shared/output/Failure.h"
 #include "tool/shared/output/Progress.h"
 
-#include <filesystem>
-
 namespace {
-
-std::string resolvedPath(const std::string& path)
-{
-    requireRegularFile(path);
-    std::error_code error;
-    const std::filesystem::path resolved = std::filesystem::canonical(path, error);
-    if (error)
-        throw Failure(systemErrorText(error.value()));
-    return resolved.string();
-}
 
 FileAccess accessFor(const std::string& target, const EditOptions& options)
 {

@@ -22,6 +22,16 @@ void requireRegularFile(const std::string& path)
                                                  : "is a device, not a regular file");
 }
 
+std::string resolvedPath(const std::string& path)
+{
+    requireRegularFile(path);
+    std::error_code error;
+    const std::filesystem::path resolved = std::filesystem::canonical(path, error);
+    if (error)
+        throw Failure(systemErrorText(error.value()));
+    return resolved.string();
+}
+
 CFileRef referenceTo(const std::string& path)
 {
     requireRegularFile(path);

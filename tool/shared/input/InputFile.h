@@ -8,6 +8,9 @@
 /// Throws the Failure that says why `path` names no regular file: missing, a folder, a FIFO, a device.
 void requireRegularFile(const std::string& path);
 
+/// The path of a regular file with its symbolic links resolved; throws Failure.
+std::string resolvedPath(const std::string& path);
+
 /// The library's reference to a regular file; throws Failure, also for a path that is not UTF-8.
 CFileRef referenceTo(const std::string& path);
 

@@ -1,24 +1,27 @@
-// Stores a text in an audio file as a chunk "note", replacing an earlier one, and reads it back; the samples stay as
-// they are. Usage: add_note FILE TEXT
-#include "audiofile/CAudioFileIO.h"
+// Stores a text in an audio file as a chunk "note", in the place of an earlier one, and reads it back. Made to a copy
+// that takes the file's place when all else is as it was. Usage: add_note FILE TEXT
+#include "audiofile/CContainerEdit.h"
+#include "audiofile/ContainerChanges.h"
 
 #include <cstdio>
-#include <cstring>
 
 int main(int argc, char** argv)
 {
     if (argc != 3)
         return 2;
-    CAudioFileIO file;
-    std::int32_t status = file.Open(CFileRef(argv[1], false), kFileIOReadWrite);
+    const NewChunk note{.id = fourCC("note"), .body = bytesOf(argv[2]), .replaces = true};
+    const auto add = [&](const std::string& copy) { return AddChunkTo(CFileRef(copy.c_str(), false), note).Status(); };
+    CContainerEdit edit;
+    std::int32_t status = edit.Begin(argv[1]).Status();
     if (status == kStatusOK)
-        status = file.AddChunk(fourCC("note"), bytesOf(argv[2]), true) == 1 ? file.Flush() : kStatusIOError;
+        status = edit.Apply(EditScope::chunk(note.id), add).Status();
     if (status != kStatusOK) {
         std::fprintf(stderr, "%s: %s\n", argv[1], StatusText(status));
         return 1;
     }
-    const std::optional<Bytes> note = file.FindChunk(fourCC("note"));
-    if (!note || textOf(*note) != argv[2])
+    CAudioFileIO file(CFileRef(argv[1], false), 0);
+    const std::optional<Bytes> found = file.FindChunk(note.id);
+    if (!found || textOf(*found) != argv[2])
         return 1;
     std::printf("%s\n", argv[2]);
     return 0;

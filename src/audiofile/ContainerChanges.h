@@ -15,7 +15,7 @@ KT_EXPORT ContainerProblem RemoveChunksFrom(const CFileRef& container, FourCC id
 
 struct NewChunk {
     FourCC id = 0;
-    BytesView body;
+    BytesView body = {};
     bool replaces = false; // all that have its id
     bool isForced = false; // also where there is an objection
 };

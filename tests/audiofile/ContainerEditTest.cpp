@@ -122,7 +122,7 @@ TEST_F(ContainerEdit, AnOpenEndIsSettledFirst)
     EXPECT_EQ(readFile(path), caf().bytes());
     folder.write("a.caf", caf(999).bytes());
     EXPECT_EQ(SettleContainerEnd(at(path)).Status(), kStatusParameterError);
-    EXPECT_EQ(AddChunkTo(at(path), {.id = kNote, .body = {}}).Status(), kStatusParameterError);
+    EXPECT_EQ(AddChunkTo(at(path), {.id = kNote}).Status(), kStatusParameterError);
     EXPECT_EQ(readFile(path), caf(999).bytes());
     EXPECT_EQ(SettleContainerEnd(at(folder.write("empty", ""))).kind, ContainerProblem::Kind::empty);
     EXPECT_EQ(SettleContainerEnd(at(folder.write("text", "no container"))).kind, ContainerProblem::Kind::noContainer);
@@ -165,7 +165,7 @@ TEST_F(ContainerEdit, WhatIsNotInTheScopeIsThereAfterwards)
         {"a chunk gone", [&](const std::string& path) { (void)RemoveChunksFrom(at(path), fourCC("keep"), 1); },
          Kind::changed, fourCC("keep")},
         {"a chunk too many",
-         [&](const std::string& path) { (void)AddChunkTo(at(path), {.id = fourCC("more"), .body = {}}); },
+         [&](const std::string& path) { (void)AddChunkTo(at(path), {.id = fourCC("more")}); },
          Kind::changed, fourCC("more")},
         {"an end too many",
          [&](const std::string& path) { std::filesystem::resize_file(path, std::filesystem::file_size(path) + 9); },

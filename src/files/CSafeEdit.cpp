@@ -89,7 +89,7 @@ std::string CSafeEdit::ownBackup() const
 {
     FileStatus found;
     for (int number = 0; number < kMostBackups; ++number) {
-        const std::string name = backupName(target_, number);
+        std::string name = backupName(target_, number);
         if (isOwnBackup(name))
             return name;
         if (!systemCalls().linkStatus(name.c_str(), &found))
@@ -227,7 +227,7 @@ FileProblem CSafeEdit::backupByCopy()
         return problem;
     for (int number = 0; number < kMostBackups; ++number) {
         const std::string name = backupName(target_, number);
-        if (const FileProblem problem = copy.Publish(name)) {
+        if (FileProblem problem = copy.Publish(name)) {
             if (problem.kind == Kind::system && problem.systemError == EEXIST)
                 continue;
             return problem;

@@ -1,6 +1,6 @@
 #include "LoopFiles.h"
 
-#include "audiofile/ContainerHeaders.h"
+#include "media/containers/ContainerHeaders.h"
 #include "loops/VireoLoopChunksManager.h"
 #include "loops/tagging/Chunks.h"
 #include "platform/core/ByteWriter.h"

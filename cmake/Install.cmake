@@ -20,7 +20,8 @@ endforeach()
 # Of what knows sound, the services and the types that they speak in; the test house.arrows reads this list too.
 set(media_headers
     media/samples/SampleConversion.h media/samples/SampleExtremes.h media/samples/StreamDescription.h
-    media/containers/AudioHandle.h media/containers/ChunkRole.h media/containers/StoredFormat.h
+    media/containers/AudioHandle.h media/containers/ContainerHeaders.h media/containers/ContainerTraits.h
+    media/containers/StoredFormat.h
     media/packets/PacketTable.h
     media/decoding/CompressedAudio.h media/decoding/ConvertingReader.h
     media/userdata/AudioFileService.h)

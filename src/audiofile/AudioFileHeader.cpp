@@ -3,7 +3,7 @@
 #include "audiofile/AudioFileHeader.h"
 
 #include "audiofile/BusFormats.h"
-#include "audiofile/ContainerHeaders.h"
+#include "media/containers/ContainerHeaders.h"
 #include "media/containers/ExtendedFloat.h"
 #include "platform/core/ByteWriter.h"
 

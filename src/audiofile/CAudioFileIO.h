@@ -4,7 +4,7 @@
 
 #include "audiofile/AudioFileInfo.h"
 #include "audiofile/CChunkData.h"
-#include "audiofile/ContainerHeaders.h"
+#include "media/containers/ContainerHeaders.h"
 #include "files/CFileIO.h"
 #include "media/userdata/AudioFileService.h"
 #include "platform/ContentType.h"

@@ -1,6 +1,6 @@
 #include "audiofile/ChunkSurvey.h"
 
-#include "media/containers/ChunkRole.h"
+#include "media/containers/ContainerTraits.h"
 
 #include <algorithm>
 

@@ -2,7 +2,7 @@
 // container goes through here, so that damaged files are read one way.
 #pragma once
 
-#include "audiofile/ContainerHeaders.h"
+#include "media/containers/ContainerHeaders.h"
 #include "platform/core/Status.h"
 
 #include <algorithm>

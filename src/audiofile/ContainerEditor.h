@@ -3,7 +3,7 @@
 #pragma once
 
 #include "audiofile/AudioFileInfo.h"
-#include "audiofile/ContainerHeaders.h"
+#include "media/containers/ContainerHeaders.h"
 #include "platform/core/Bytes.h"
 
 #include <cstdint>

@@ -1,6 +1,6 @@
 #include "audiofile/AudioFileLimits.h"
 
-#include "audiofile/ContainerHeaders.h"
+#include "media/containers/ContainerHeaders.h"
 
 #include <gtest/gtest.h>
 

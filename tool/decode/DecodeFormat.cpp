@@ -2,7 +2,7 @@
 
 #include "audiofile/AudioFileHeader.h"
 #include "audiofile/AudioFileLimits.h"
-#include "audiofile/ContainerHeaders.h"
+#include "media/containers/ContainerHeaders.h"
 #include "files/AudioFileTypes.h"
 #include "tool/shared/output/Failure.h"
 

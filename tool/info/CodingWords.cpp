@@ -1,6 +1,6 @@
 #include "tool/info/CodingWords.h"
 
-#include "audiofile/ContainerHeaders.h"
+#include "media/containers/ContainerHeaders.h"
 
 #include <fmt/format.h>
 

@@ -1,7 +1,7 @@
 #include "tool/overview/OverviewStore.h"
 
 #include "audiofile/ContainerChanges.h"
-#include "audiofile/ContainerHeaders.h"
+#include "media/containers/ContainerHeaders.h"
 #include "loops/overview/StoredOverview.h"
 #include "tool/shared/edits/EditProblems.h"
 #include "tool/shared/input/InputFile.h"

@@ -1,5 +1,5 @@
 // ktfiles tags set, and remove: the same edit, with values and without.
-#include "audiofile/ContainerHeaders.h"
+#include "media/containers/ContainerHeaders.h"
 #include "tool/shared/arguments/CommandLine.h"
 #include "tool/shared/looptags/LoopTagFields.h"
 #include "tool/shared/looptags/LoopTagsEdit.h"

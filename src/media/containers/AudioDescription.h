@@ -1,7 +1,7 @@
 // What a container says of its samples: format, place, number.
 #pragma once
 
-#include "media/containers/ChunkScanner.h"
+#include "media/containers/ContainerLayout.h"
 #include "media/samples/StreamDescription.h"
 
 #include <cstdint>

@@ -1,7 +1,7 @@
 // The size fields of a container: which of them to rewrite when the container or one of its chunks gets another size.
 #pragma once
 
-#include "media/containers/ChunkScanner.h"
+#include "media/containers/ContainerLayout.h"
 
 namespace platform {
 

@@ -2,7 +2,7 @@
 #pragma once
 
 #include "media/containers/AudioDescription.h"
-#include "media/containers/ChunkScanner.h"
+#include "media/containers/ContainerLayout.h"
 #include "media/packets/MPEGFrameHeader.h"
 #include "media/packets/PacketFile.h"
 #include "media/packets/PacketIndex.h"

@@ -2,7 +2,7 @@
 #pragma once
 
 #include "media/containers/AudioDescription.h"
-#include "media/containers/ChunkScanner.h"
+#include "media/containers/ContainerLayout.h"
 #include "media/containers/FileBytes.h"
 #include "media/userdata/AudioFileService.h"
 

@@ -1,6 +1,6 @@
 #include "media/userdata/AudioFileService.h"
 
-#include "media/containers/ChunkRole.h"
+#include "media/containers/ContainerTraits.h"
 #include "media/userdata/AudioFileImplementation.h"
 #include "media/userdata/UserDataEditor.h"
 #include "platform/SystemCalls.h"

@@ -1,7 +1,7 @@
 // Writes chunks one behind the other, gathered into few calls.
 #pragma once
 
-#include "media/containers/ChunkScanner.h"
+#include "media/containers/ContainerLayout.h"
 
 namespace platform {
 

@@ -1,7 +1,7 @@
 // Crash-safe edits of a container's user data: docs/formats/user-data-edits.md says how, container by container.
 #pragma once
 
-#include "media/containers/ChunkScanner.h"
+#include "media/containers/ContainerLayout.h"
 
 #include <cstddef>
 #include <cstdint>

@@ -1,9 +1,9 @@
 #include "tool/shared/looptags/LoopTags.h"
 
 #include "audiofile/CAudioFileIO.h"
-#include "audiofile/ContainerHeaders.h"
 #include "loops/VireoLoopTerms.h"
 #include "loops/VireoLoopUserDataUtils.h"
+#include "media/containers/ContainerHeaders.h"
 #include "tool/shared/input/InputFile.h"
 #include "tool/shared/looptags/LoopTagFields.h"
 #include "tool/shared/output/JsonWriter.h"

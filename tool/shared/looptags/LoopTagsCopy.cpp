@@ -1,6 +1,6 @@
 #include "tool/shared/looptags/LoopTagsCopy.h"
 
-#include "audiofile/ContainerHeaders.h"
+#include "media/containers/ContainerHeaders.h"
 #include "tool/shared/looptags/LoopTagFields.h"
 #include "tool/shared/looptags/LoopTagsPatch.h"
 #include "tool/shared/looptags/TagsCarrier.h"

@@ -1,6 +1,6 @@
 #include "tool/shared/looptags/LoopTagsPatch.h"
 
-#include "audiofile/ContainerHeaders.h"
+#include "media/containers/ContainerHeaders.h"
 #include "loops/VireoLoopFileInfoChunkDataTypes.h"
 #include "platform/String.h"
 #include "tool/shared/looptags/LoopTagsLayouts.h"

@@ -1,5 +1,5 @@
 // The CAF side of LoopTagsPatch.
-#include "audiofile/ContainerHeaders.h"
+#include "media/containers/ContainerHeaders.h"
 #include "loops/VireoLoopCombinedTagsChunkDataTypes.h"
 #include "loops/VireoLoopTerms.h"
 #include "tool/shared/looptags/CAFTextPairs.h"

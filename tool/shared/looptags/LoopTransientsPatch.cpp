@@ -1,5 +1,5 @@
 // The transients' side of LoopTagsPatch.
-#include "audiofile/ContainerHeaders.h"
+#include "media/containers/ContainerHeaders.h"
 #include "loops/tagging/Chunks.h"
 #include "tool/shared/looptags/LoopTagsPatch.h"
 

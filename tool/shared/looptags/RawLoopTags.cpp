@@ -1,6 +1,6 @@
 #include "tool/shared/looptags/RawLoopTags.h"
 
-#include "audiofile/ContainerHeaders.h"
+#include "media/containers/ContainerHeaders.h"
 #include "loops/VireoLoopCombinedTagsChunkData.h"
 #include "loops/VireoLoopUserDataUtils.h"
 #include "platform/core/Status.h"

@@ -1,4 +1,4 @@
-#include "media/containers/ChunkRole.h"
+#include "media/containers/ContainerTraits.h"
 
 #include <algorithm>
 #include <span>

@@ -1,4 +1,4 @@
-#include "audiofile/ContainerHeaders.h"
+#include "media/containers/ContainerHeaders.h"
 
 #include <algorithm>
 

@@ -1,4 +1,4 @@
-#include "media/containers/ChunkScanner.h"
+#include "media/containers/ContainerLayout.h"
 
 #include "media/containers/StoredFormat.h"
 #include "platform/core/Packed.h"

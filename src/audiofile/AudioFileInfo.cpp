@@ -1,80 +1,36 @@
 #include "audiofile/AudioFileInfo.h"
 
+#include "audiofile/BusFormats.h"
 #include "audiofile/ContainerDescriptions.h"
 #include "files/CFileIO.h"
+#include "loops/tagging/ChunkIDs.h"
+#include "loops/tagging/Chunks.h"
+#include "loops/tagging/LoopTiming.h"
+#include "media/containers/AudioDescription.h"
+#include "media/decoding/CompressedAudio.h"
 
+#include <array>
 #include <cmath>
+#include <optional>
 
 namespace {
 
-// What REX2 holds below its first chunk is compressed in a way of its own.
-std::int32_t describeREX2(AudioFileInfo& info)
+using platform::ContainerKind;
+
+TAudioBusFormat busFormatOf(const platform::StoredFormat& format, std::int32_t channels)
 {
-    info.containerId = kCAT;
-    info.formType = kREX2;
-    info.compressed = true;
-    info.bitsPerSample = 0;
-    info.channels = 0;
-    SetSampleRate(info, 0);
-    return kStatusOK;
+    return format.speakers ? BusFormatOf(*format.speakers, channels) : AudioBusFormatForChannels(channels);
 }
 
-std::int32_t describe(FileWindow& file, const platform::URLRef& url, AudioFileInfo& info)
-{
-    std::array<std::byte, 16> start{};
-    const std::size_t there = file.readSome(start.data(), 0, start.size());
-    if (there >= 8 && loadBE<FourCC>(start.data()) == kCaff) {
-        info.fileType = kCaff;
-        return DescribeCAF(file, url, info);
-    }
-    if (there >= 4 && loadBE<FourCC>(start.data()) == fourCC("fLaC"))
-        return DescribeFLAC(file, info);
-    info.fileType = ChunkedContainerKind(start);
-    switch (info.fileType) {
-    case kWAVE:
-        return DescribeWAVE(file, info);
-    case kAIFF:
-        return DescribeAIFF(file, info);
-    case kREX2:
-        return describeREX2(info);
-    default:
-        return url ? DescribeCompressed(*url, BytesView(start).first(there), info)
-                   : std::int32_t{kStatusParameterError};
-    }
-}
-
-} // namespace
-
-std::int32_t GetAudioFileInfo(CFileIO& file, unsigned int /*permission*/, AudioFileInfo& info)
-{
-    // no call where none is needed
-    FileWindow window(file, file.IsOpenForWriting() ? file.GetEOF() : file.LengthAtOpen());
-    return DescribeAudioFile(window, file.IsMemoryFile() ? nullptr : file.URL(), info);
-}
-
-std::int32_t DescribeAudioFile(FileWindow& file, const platform::URLRef& url, AudioFileInfo& info)
-{
-    info = {};
-    info.fileLength = file.length();
-    const std::int32_t status = describe(file, url, info);
-    return file.failure() != kStatusOK ? file.failure() : status;
-}
-
-void SetSampleRate(AudioFileInfo& info, double rate)
-{
-    constexpr double highest = 9007199254740992.0;
-    info.exactSampleRate = rate > 0 && rate <= highest ? rate : 0;
-    info.sampleRate = std::llround(info.exactSampleRate);
-}
-
-void SetStoredFormat(AudioFileInfo& info, const platform::StoredFormat& format)
+/// Channels, rate and coding; of linear PCM also how its samples stand, left-aligned in their bytes.
+void setStoredFormat(AudioFileInfo& info, const platform::StoredFormat& format)
 {
     constexpr std::uint32_t mostChannels = 0xFFFF; // more than that is no sound but a damaged header
     platform::StreamDescription stream = format.stream;
     if (stream.channelsPerFrame > mostChannels)
         stream.channelsPerFrame = stream.bytesPerFrame = 0;
     info.channels = static_cast<std::int32_t>(stream.channelsPerFrame);
-    info.busFormat = AudioBusFormatForChannels(info.channels);
+    info.busFormat = busFormatOf(format, info.channels);
     SetSampleRate(info, stream.sampleRate);
     info.formatCode = format.coding;
     const std::uint32_t bytesPerSample =
@@ -95,13 +51,131 @@ void SetStoredFormat(AudioFileInfo& info, const platform::StoredFormat& format)
     info.bytesPerFrame = static_cast<std::int32_t>(stream.bytesPerFrame);
 }
 
-void SetSampleData(AudioFileInfo& info, std::int64_t offset, std::uint64_t size)
+/// The loop fields, behind all others.
+void setLoopTiming(AudioFileInfo& info, const std::optional<tagging::LoopTiming>& timing)
 {
-    info.dataOffset = offset;
-    const std::int64_t there = std::max<std::int64_t>(info.fileLength - offset, 0);
-    info.dataSize = static_cast<std::int64_t>(std::min<std::uint64_t>(size, static_cast<std::uint64_t>(there)));
-    constexpr std::uint64_t toTheEnd = INT64_MAX; // of a recording that does not say how long it is
-    info.missingDataSize = size < toTheEnd ? static_cast<std::int64_t>(size) - info.dataSize : 0;
+    if (!timing)
+        return;
+    const double beats = std::max(timing->beatCount, 0);
+    info.beatCount = static_cast<float>(beats);
+    info.timingFlag = 1;
+    info.loopCount = timing->isLoop ? 1 : 0;
+    if (info.frames > 0)
+        info.loopValue = static_cast<float>(beats * 60 * info.exactSampleRate / static_cast<double>(info.frames));
+}
+
+/// Of a chunk that is the basic tagging of a loop; none for any other.
+std::optional<tagging::LoopTiming> readLoopTiming(FileWindow& file, ContainerKind kind,
+                                                  const platform::WalkedChunk& chunk)
+{
+    const auto size = static_cast<std::uint64_t>(chunk.size);
+    if (kind == ContainerKind::iff && chunk.id == tagging::kBasicTagging) {
+        std::array<std::byte, sizeof(tagging::BasicTaggingChunk)> bytes;
+        const bool there = size >= bytes.size() && file.read(bytes.data(), chunk.body, bytes.size()) == kStatusOK;
+        return there ? tagging::LoopTimingInAIFF(bytes) : std::nullopt;
+    }
+    constexpr std::uint64_t most = 1 << 20; // bytes of text that are looked at
+    tagging::UUIDBytes uuid;
+    if (kind != ContainerKind::caf || chunk.id != kUuid || size < sizeof uuid ||
+        file.read(uuid, chunk.body, sizeof uuid) != kStatusOK || cafChunkUUIDToChunkID(&uuid) != tagging::kBasicTagging)
+        return std::nullopt;
+    const std::uint64_t start = chunk.body + sizeof uuid;
+    Bytes payload(static_cast<std::size_t>(std::min({size - sizeof uuid, file.length() - start, most})));
+    payload.resize(file.readSome(payload.data(), start, payload.size()));
+    return tagging::LoopTimingInCAF(payload);
+}
+
+/// What the packets of a CAF file hold that are there, where the library finds them.
+void countPackets(const platform::URLRef& url, const platform::StoredFormat& format, AudioFileInfo& info)
+{
+    platform::CompressedAudio packets;
+    if (!url || platform::describePackets(*url, packets) != kStatusOK)
+        return;
+    info.framesAreStated = false;
+    SetSampleRate(info, packets.format.sampleRate);
+    info.channels = static_cast<std::int32_t>(packets.format.channelsPerFrame);
+    info.busFormat = busFormatOf(format, info.channels);
+    info.sourceBits = static_cast<std::int32_t>(packets.format.bitsPerChannel);
+    info.frames = static_cast<std::int64_t>(packets.frames);
+    SetSoundFacts(info, packets.facts);
+}
+
+/// 0, or kStatusEndOfFile when what a file of the kind cannot do without is missing.
+std::int32_t describeContainer(FileWindow& file, platform::ChunkWalk& walk, const platform::URLRef& url,
+                               AudioFileInfo& info)
+{
+    const platform::Container& container = walk.container();
+    const ContainerKind kind = container.traits->kind;
+    info.fileType = container.traits->fileType;
+    info.containerId = container.traits->isEditable ? container.id : info.fileType;
+    info.formType = container.formType;
+    if (kind == ContainerKind::rex2) { // what it holds below its first chunk is compressed in a way of its own
+        info.containerId = kCAT;
+        info.compressed = true;
+        info.bitsPerSample = info.channels = 0;
+        SetSampleRate(info, 0);
+        return kStatusOK;
+    }
+    const bool mayHaveTiming = kind == ContainerKind::iff || kind == ContainerKind::caf;
+    std::optional<tagging::LoopTiming> timing;
+    platform::AudioDescriber describer(file, container);
+    while (!(describer.isComplete() && (timing || !mayHaveTiming)) && walk.next()) {
+        describer.meet(walk.chunk());
+        if (!timing)
+            timing = readLoopTiming(file, kind, walk.chunk());
+    }
+    const platform::AudioDescription audio = describer.description();
+    info.dataOffset = static_cast<std::int64_t>(audio.dataOffset);
+    info.dataSize = static_cast<std::int64_t>(audio.dataSize);
+    info.missingDataSize = static_cast<std::int64_t>(audio.missingDataSize);
+    if (!audio.format)
+        return kStatusEndOfFile;
+    setStoredFormat(info, *audio.format);
+    info.speakers = audio.layout;
+    info.frames = info.compressed || info.bytesPerFrame > 0 ? static_cast<std::int64_t>(audio.frames) : 0;
+    info.framesAreStated = audio.framesAreStated || (info.compressed && audio.stream().isLinearPCM());
+    if (kind == ContainerKind::caf && info.compressed)
+        countPackets(url, *audio.format, info);
+    setLoopTiming(info, timing);
+    const bool needsSound = kind != ContainerKind::iff || audio.format->countedPackets > 0;
+    return needsSound && !audio.hasSound ? kStatusEndOfFile : kStatusOK;
+}
+
+std::int32_t describe(FileWindow& file, const platform::URLRef& url, AudioFileInfo& info)
+{
+    std::array<std::byte, 16> start{};
+    const std::size_t there = file.readSome(start.data(), 0, start.size());
+    if (there >= 4 && loadBE<FourCC>(start.data()) == fourCC("fLaC"))
+        return DescribeFLAC(file, info);
+    platform::ChunkWalk walk(file, platform::WalkPolicy::toTheSound);
+    const std::int32_t status = walk.begin();
+    if (status != kStatusParameterError)
+        return status == kStatusOK ? describeContainer(file, walk, url, info) : status;
+    return url ? DescribeCompressed(*url, BytesView(start).first(there), info) : std::int32_t{kStatusParameterError};
+}
+
+} // namespace
+
+std::int32_t GetAudioFileInfo(CFileIO& file, unsigned int /*permission*/, AudioFileInfo& info)
+{
+    // no call where none is needed
+    FileWindow window(file, file.IsOpenForWriting() ? file.GetEOF() : file.LengthAtOpen());
+    return DescribeAudioFile(window, file.IsMemoryFile() ? nullptr : file.URL(), info);
+}
+
+std::int32_t DescribeAudioFile(FileWindow& file, const platform::URLRef& url, AudioFileInfo& info)
+{
+    info = {};
+    info.fileLength = file.fileLength();
+    const std::int32_t status = describe(file, url, info);
+    return file.failure() != kStatusOK ? file.failure() : status;
+}
+
+void SetSampleRate(AudioFileInfo& info, double rate)
+{
+    constexpr double highest = 9007199254740992.0;
+    info.exactSampleRate = rate > 0 && rate <= highest ? rate : 0;
+    info.sampleRate = std::llround(info.exactSampleRate);
 }
 
 void SetSoundFacts(AudioFileInfo& info, const platform::SoundFacts& facts)
@@ -116,18 +190,6 @@ void SetSoundFacts(AudioFileInfo& info, const platform::SoundFacts& facts)
     info.promisedFrames = std::max(info.promisedFrames, promised);
     if (info.promisedFrames <= info.frames)
         info.promisedFrames = 0;
-}
-
-void SetLoopTiming(AudioFileInfo& info, const std::optional<tagging::LoopTiming>& timing)
-{
-    if (!timing)
-        return;
-    const double beats = std::max(timing->beatCount, 0);
-    info.beatCount = static_cast<float>(beats);
-    info.timingFlag = 1;
-    info.loopCount = timing->isLoop ? 1 : 0;
-    if (info.frames > 0)
-        info.loopValue = static_cast<float>(beats * 60 * info.exactSampleRate / static_cast<double>(info.frames));
 }
 
 std::uint32_t AudioFileInfo::VireoLoopTempo() const

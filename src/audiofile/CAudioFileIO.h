@@ -4,8 +4,8 @@
 
 #include "audiofile/AudioFileInfo.h"
 #include "audiofile/CChunkData.h"
-#include "media/containers/ContainerHeaders.h"
 #include "files/CFileIO.h"
+#include "media/containers/ContainerHeaders.h"
 #include "media/userdata/AudioFileService.h"
 #include "platform/ContentType.h"
 #include "platform/core/Error.h"
@@ -30,9 +30,10 @@ struct ChunkEntry {
 
 /// Where a container begins and ends.
 struct ContainerExtent {
-    FourCC id = 0; // "RIFF", "RF64", "BW64", "FORM", "caff", "CAT "
+    FourCC id = 0; // "RIFF", "RF64", "BW64", "FORM", "caff", "CAT ", "RIFX", "W64f"
     std::int64_t end = 0;
     std::int64_t fileLength = 0;
+    platform::ContainerKind kind = platform::ContainerKind::riff;
 };
 
 /// Of a file that is open for reading only, container headers are kept once read, until the file's length or the time
@@ -66,8 +67,10 @@ public:
     /// "WAVE", "AIFF", "REX2", or 0: what kind of chunked container is open. CAF files have a walk of their own and
     /// give 0.
     FourCC IsChunkBased();
-    /// Whether the open file has chunks: IsChunkBased() knows its container, or it is CAF.
+    /// Whether the open file has chunks, which ForEachChunk and LocateChunk find.
     bool HasChunks();
+    /// Whether it takes more of them: IsChunkBased() knows its container, or it is CAF. RIFX and Wave64 are only read.
+    bool TakesChunks();
     /// 0, or -3.
     std::int32_t ReadExtendedFileHeader(ContainerChkExtended& header);
     /// The position of the chunk after `current`, whose header goes to `next`; position 0 asks for the first. The walk
@@ -179,6 +182,7 @@ private:
         std::int64_t size = 0;
         std::int64_t next = 0;
         std::int64_t fileLength = 0; // when it was found
+        bool isEditable = false;     // that its container is
         bool HasItsBytes() const { return size >= 0 && size <= fileLength - body; }
     };
     std::int32_t Locate(FourCC id, FoundChunk& found);
@@ -190,7 +194,6 @@ private:
     std::int32_t ReadBytes(void* to, const FoundChunk& found);
     std::int32_t ReadBody(const FoundChunk& found, std::unique_ptr<char[]>& data);
     std::int32_t OpenUndescribed(const CFileRef& ref, unsigned int permission);
-    bool BeginsAsCAF();
     void Describe(unsigned int permission);
 
     AudioFileInfo mInfo;

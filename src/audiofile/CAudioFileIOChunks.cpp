@@ -1,7 +1,8 @@
 // CAudioFileIO: recognising the container, walking it, finding chunks in it.
 #include "audiofile/CAudioFileIO.h"
 
-#include "audiofile/ContainerWalk.h"
+#include "audiofile/FileWindow.h"
+#include "media/containers/ChunkWalk.h"
 
 #include <algorithm>
 #include <array>
@@ -16,43 +17,51 @@ constexpr std::int32_t kNoContainer = -2;
 constexpr std::int32_t kHeaderUnreadable = -3;
 constexpr std::int32_t kBodyUnreadable = -5;
 
-/// What the container walk and the CAF walk hand to ForEachChunk's visitor.
-class ChunkVisitor {
-public:
-    explicit ChunkVisitor(const std::function<bool(const ChunkEntry&)>& visit) : visit_(visit) {}
+using platform::ChunkWalk;
+using platform::ContainerKind;
+using platform::WalkPolicy;
 
-    /// Zeros are what some writers leave behind the last chunk; a walk gets no further there.
-    bool operator()(FourCC id, std::int64_t position, std::int64_t size) const
-    {
-        return visit_ && (id != 0 || size != 0) && visit_({id, position, size});
-    }
-
-private:
-    const std::function<bool(const ChunkEntry&)>& visit_;
-};
+/// Begins the walk: 0, -2 where there is no container, -3 for one whose header cannot be read.
+std::int32_t begin(ChunkWalk& walk)
+{
+    if (walk.begin() == kStatusOK)
+        return walk.container().traits->hasChunks ? std::int32_t{kStatusOK} : kNoContainer;
+    return walk.container().traits == nullptr ? kNoContainer : kHeaderUnreadable;
+}
 
 } // namespace
 
 FourCC CAudioFileIO::IsChunkBased()
 {
     std::array<std::byte, 16> start;
-    return IsOpen() && Read(start.data(), 0, start.size(), nullptr) == kStatusOK ? ChunkedContainerKind(start) : 0;
+    if (!IsOpen() || Read(start.data(), 0, start.size(), nullptr) != kStatusOK)
+        return 0;
+    const platform::ContainerTraits* traits = platform::recogniseContainer(start);
+    return traits != nullptr && traits->isEditable && traits->kind != ContainerKind::caf ? traits->fileType : 0;
 }
 
 bool CAudioFileIO::HasChunks()
 {
-    return IsOpen() && (mInfo.fileType == kCaff || BeginsAsCAF() || IsChunkBased() != 0);
+    std::array<std::byte, platform::kMostOfContainerStart> start;
+    long there = 0;
+    if (!IsOpen())
+        return false;
+    Read(start.data(), 0, start.size(), &there);
+    const auto count = static_cast<std::size_t>(std::max(there, 0L));
+    const platform::ContainerTraits* traits = platform::recogniseContainer(BytesView(start).first(count));
+    return traits != nullptr && traits->hasChunks;
 }
 
-bool CAudioFileIO::BeginsAsCAF()
+bool CAudioFileIO::TakesChunks()
 {
-    std::array<std::byte, 8> start; // id, version and flags
-    return Read(start.data(), 0, start.size(), nullptr) == kStatusOK && loadBE<FourCC>(start.data()) == kCaff;
+    return IsOpen() && (IsOpenCAF() || IsChunkBased() != 0);
 }
 
 std::int32_t CAudioFileIO::ReadExtendedFileHeader(ContainerChkExtended& header)
 {
-    return ReadContainerHeader(*this, header);
+    std::optional<FileWindow> own;
+    return platform::readContainerHeader(Window(own), header) == kStatusOK ? std::int32_t{kStatusOK}
+                                                                           : kHeaderUnreadable;
 }
 
 long long CAudioFileIO::NextChunkHeader(long long position, ChkHeader* current, ChkHeader* next, int* error,
@@ -60,8 +69,9 @@ long long CAudioFileIO::NextChunkHeader(long long position, ChkHeader* current, 
 {
     ChkHeader none;
     std::int32_t status = kStatusOK;
-    const std::int64_t result = NextChunk(*this, header, position, current != nullptr ? *current : none,
-                                          next != nullptr ? *next : none, status);
+    std::optional<FileWindow> own;
+    const std::int64_t result = platform::nextChunkHeader(
+        Window(own), header, position, current != nullptr ? *current : none, next != nullptr ? *next : none, status);
     if (error != nullptr)
         *error = status;
     return result;
@@ -88,27 +98,23 @@ std::int32_t CAudioFileIO::ForEachChunk(const std::function<bool(const ChunkEntr
         return kNotOpen;
     std::optional<FileWindow> own;
     FileWindow& window = Window(own);
-    const ChunkVisitor visitor(visit);
-    if (IsOpenCAF()) {
-        if (extent != nullptr)
-            *extent = {kCaff, window.length(), window.length()};
-        return WalkCAFChunks(window, [&](FourCC id, std::int64_t position, std::int64_t size) {
-            const std::int64_t toTheEnd = window.length() - position - std::int64_t{sizeof(CAFChunkHeader)};
-            return visitor(id, position, size == -1 && id == kData ? toTheEnd : size);
-        });
-    }
-    if (ChunkedContainerKind(window) == 0)
-        return kNoContainer;
-    ContainerChkExtended header;
-    if (ReadContainerHeader(window, header) != kStatusOK)
-        return kHeaderUnreadable;
-    const std::int64_t end = ContainerEnd(header, window.length());
+    ChunkWalk walk(window, WalkPolicy::asStated);
+    if (const std::int32_t status = begin(walk); status != kStatusOK)
+        return status;
+    const platform::ContainerTraits& traits = *walk.container().traits;
     if (extent != nullptr)
-        *extent = {header.id, end, window.length()};
-    const std::int32_t status = WalkChunks(window, header, end, [&](const WalkedChunk& chunk) {
-        return visitor(chunk.header.id, chunk.position, chunk.size);
-    });
-    return status == kWalkStuck ? std::int32_t{kStatusOK} : status;
+        *extent = {traits.isEditable ? walk.container().id : traits.fileType, walk.statedEnd(), window.fileLength(),
+                   traits.kind};
+    while (visit && walk.next()) {
+        const platform::WalkedChunk& chunk = walk.chunk();
+        const bool isOpen = traits.kind == ContainerKind::caf && chunk.size == -1 && chunk.id == traits.soundId;
+        const std::int64_t size = isOpen ? window.fileLength() - static_cast<std::int64_t>(chunk.body) : chunk.size;
+        // Zeros are what some writers leave behind the last chunk; a walk gets no further there.
+        const bool isNone = chunk.id == 0 && size == 0;
+        if (isNone || !visit({chunk.id, static_cast<std::int64_t>(chunk.position), size}))
+            return kStatusOK;
+    }
+    return walk.status();
 }
 
 /// The walk goes on behind a match, so that the last of several chunks is the one found; in CAF it is the first that is
@@ -119,42 +125,34 @@ std::int32_t CAudioFileIO::Locate(FourCC id, FoundChunk& found)
         return kNotOpen;
     std::optional<FileWindow> own;
     FileWindow& window = Window(own);
+    ChunkWalk walk(window, WalkPolicy::asStated);
+    if (const std::int32_t status = begin(walk); status != kStatusOK)
+        return status;
+    const bool isCAF = walk.container().traits->kind == ContainerKind::caf;
+    const bool isEditable = found.isEditable = walk.container().traits->isEditable;
     std::int32_t result = kNotFound;
-    const auto keep = [&](std::int64_t position, std::size_t headerSize, std::int64_t size, std::int64_t next) {
-        found = {position, position + static_cast<std::int64_t>(headerSize), size, next, window.length()};
+    while (walk.next()) {
+        const platform::WalkedChunk& chunk = walk.chunk();
+        if (chunk.id != id || (isCAF && chunk.size <= 0))
+            continue;
+        found = {static_cast<std::int64_t>(chunk.position),
+                 static_cast<std::int64_t>(chunk.body),
+                 chunk.size,
+                 walk.following(),
+                 window.fileLength(),
+                 isEditable};
         result = kFound;
-    };
-    if (IsOpenCAF()) {
-        const std::int32_t status =
-            WalkCAFChunks(window, [&](FourCC chunkId, std::int64_t position, std::int64_t size) {
-                const bool matches = chunkId == id && size > 0;
-                std::int64_t next = 0;
-                if (matches) {
-                    if (__builtin_add_overflow(position + std::int64_t{sizeof(CAFChunkHeader)}, size, &next))
-                        next = INT64_MAX;
-                    keep(position, sizeof(CAFChunkHeader), size, next);
-                }
-                return !matches;
-            });
-        return status == kStatusOK ? result : status;
+        if (isCAF)
+            break;
     }
-    if (ChunkedContainerKind(window) == 0)
-        return kNoContainer;
-    ContainerChkExtended header;
-    if (ReadContainerHeader(window, header) != kStatusOK)
-        return kHeaderUnreadable;
-    const std::int64_t end = ContainerEnd(header, window.length());
-    const std::int32_t status = WalkChunks(window, header, end, [&](const WalkedChunk& chunk) {
-        if (chunk.header.id == id)
-            keep(chunk.position, sizeof(ChkHeader), chunk.size, chunk.next);
-        return true;
-    });
-    return status == kStatusOK || status == kWalkStuck ? result : status;
+    return walk.status() == kStatusOK ? result : walk.status();
 }
 
 std::int32_t CAudioFileIO::Find(FourCC id, FoundChunk& found)
 {
-    const std::int32_t result = Locate(id, found);
+    std::int32_t result = Locate(id, found);
+    if (result >= kNotFound && !found.isEditable)
+        result = kNoContainer;
     const bool isFailure = result != kFound && result != kNotOpen;
     return IsOpenCAF() && isFailure ? kNotFound : result;
 }
@@ -171,7 +169,7 @@ std::int32_t CAudioFileIO::ReadBytes(void* to, const FoundChunk& found)
 {
     constexpr std::int64_t small = 512; // likely in the window with its header
     if (mWindow && found.size <= small &&
-        mWindow->read(to, found.body, static_cast<std::size_t>(found.size)) == kStatusOK)
+        mWindow->read(to, static_cast<std::uint64_t>(found.body), static_cast<std::size_t>(found.size)) == kStatusOK)
         return kStatusOK;
     return Read(to, found.body, static_cast<long>(found.size), nullptr);
 }

@@ -108,7 +108,7 @@ ContainerProblem ChunkInventory::walk(const EditScope& scope)
         return problem;
     ContainerExtent extent;
     const auto visit = [&](const ChunkEntry& chunk) {
-        const std::int64_t body = ChunkBodyOffset(chunk, extent);
+        const std::int64_t body = chunk.body;
         const std::int64_t there = std::max<std::int64_t>(extent.fileLength - body, 0);
         const std::int64_t size = std::clamp<std::int64_t>(chunk.size, 0, there);
         const bool inScope = isInScope(scope, chunk.id, body, size, problem);

@@ -7,14 +7,9 @@
 namespace {
 
 // Whether it makes up the sound, or the way to it. A container has one of each.
-bool isStructural(FourCC container, FourCC id)
+bool isStructural(const ContainerExtent& extent, FourCC id)
 {
-    using Kind = platform::ContainerKind;
-    const Kind kind = container == kFORM   ? Kind::iff
-                      : container == kCaff ? Kind::caf
-                      : container == kCAT  ? Kind::rex2
-                                           : Kind::riff;
-    return platform::roleOfChunk(kind, id) == platform::ChunkRole::essential;
+    return platform::roleOfChunk(extent.kind, id) == platform::ChunkRole::essential;
 }
 
 } // namespace
@@ -36,15 +31,10 @@ ContainerProblem SurveyChunks(CAudioFileIO& file, FourCC id, ChunkSurvey& survey
     return ContainerProblem::ofStatus(file.ForEachChunk(visit, &survey.extent), ContainerProblem::Kind::chunks);
 }
 
-std::int64_t ChunkBodyOffset(const ChunkEntry& chunk, const ContainerExtent& extent)
-{
-    return chunk.offset + static_cast<std::int64_t>(extent.id == kCaff ? sizeof(CAFChunkHeader) : sizeof(ChkHeader));
-}
-
 ContainerProblem ObjectToAdding(CAudioFileIO& file, const ChunkSurvey& survey, FourCC id, ChunkObjection& objection)
 {
     objection = {};
-    if (survey.count > 0 && isStructural(survey.extent.id, id)) {
+    if (survey.count > 0 && isStructural(survey.extent, id)) {
         objection.kind = ChunkObjection::Kind::oneOnly;
         return {};
     }
@@ -56,6 +46,6 @@ ContainerProblem ObjectToAdding(CAudioFileIO& file, const ChunkSurvey& survey, F
 
 ChunkObjection ObjectionToRemoving(const ChunkSurvey& survey, FourCC id)
 {
-    const bool isLost = survey.count > 0 && isStructural(survey.extent.id, id);
+    const bool isLost = survey.count > 0 && isStructural(survey.extent, id);
     return {isLost ? ChunkObjection::Kind::soundLost : ChunkObjection::Kind::none, {}};
 }

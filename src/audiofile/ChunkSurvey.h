@@ -20,9 +20,6 @@ struct ChunkSurvey {
 /// Problem: chunks.
 KT_EXPORT ContainerProblem SurveyChunks(CAudioFileIO& file, FourCC id, ChunkSurvey& survey);
 
-/// File offset of the first byte behind a chunk's header.
-KT_EXPORT std::int64_t ChunkBodyOffset(const ChunkEntry& chunk, const ContainerExtent& extent);
-
 /// Why chunks should not be added or removed: sound or other data would be lost. An edit is possible all the same.
 struct ChunkObjection {
     enum class Kind : std::uint8_t {

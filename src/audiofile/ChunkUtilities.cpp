@@ -48,11 +48,6 @@ bool isUnfinished(const CFileRef& sidecar)
            std::string_view(start.data(), compared) == id.substr(0, compared);
 }
 
-bool takesChunks(CAudioFileIO& file)
-{
-    return file.HasChunks();
-}
-
 bool isTaggedLoop(const AudioFileInfo& info)
 {
     return info.loopCount >= 1 && info.loopValue > 0;
@@ -129,7 +124,7 @@ std::int32_t CFileUtilAddData(const CFileRef& file, const CChunkData& chunk, con
     transform(copy.get(), size, kWriting);
     if (target.IsOpen() && target.InfoStatus() == kStatusIOError) // what it is, nobody knows
         return kStatusIOError;
-    if (takesChunks(target)) {
+    if (target.TakesChunks()) {
         target.PrepareToAppend(); // Kept: where that refuses, AddChunk does what it can
         return statusOfAdding(target.AddChunk(chunk.id, copy.get(), size, true), kStatusOK);
     }
@@ -140,7 +135,7 @@ std::int32_t CFileUtilAddData(const CFileRef& file, const CChunkData& chunk, con
     const std::int32_t opened = openMetadataSidecar(metadata, sidecarOf(file, kMetadataExtension));
     if (opened != kStatusOK)
         return opened;
-    if (!takesChunks(metadata)) // AddChunk, which removes first, would fail in a way that is not reported
+    if (!metadata.TakesChunks()) // AddChunk, which removes first, would fail in a way that is not reported
         return kStatusIOError;
     return statusOfAdding(metadata.AddChunk(chunk.id, copy.get(), size, true), raw);
 }
@@ -164,7 +159,7 @@ std::int32_t CFileUtilReadData(const CFileRef& file, CChunkData& chunk, const ch
         if (readFrom(in, chunk, transform) == kStatusOK)
             return kStatusOK;
     }
-    return takesChunks(itself) ? readFrom(itself, chunk, transform) : kNotFound;
+    return itself.TakesChunks() ? readFrom(itself, chunk, transform) : kNotFound;
 }
 
 std::int32_t CFileUtilRemoveData(const CFileRef& file, const CChunkData& chunk, const char* extension)
@@ -176,7 +171,7 @@ std::int32_t CFileUtilRemoveData(const CFileRef& file, const CChunkData& chunk, 
         first.RemoveChunk(chunk.id);
     // Kept: a second pass, which finds a second chunk in a CAF file and nothing in others.
     CAudioFileIO second(file, kFileIOReadWrite);
-    if (takesChunks(second))
+    if (second.TakesChunks())
         status = second.RemoveChunk(chunk.id);
     return status;
 }

@@ -31,8 +31,8 @@ ContainerProblem OpenContainer(CAudioFileIO& file, const CFileRef& ref, unsigned
         return ContainerProblem::ofStatus(status);
     if (file.GetEOF() == 0)
         return {Kind::empty};
-    if (!file.HasChunks())
-        return {Kind::noContainer};
+    if (!file.TakesChunks())
+        return {file.HasChunks() ? Kind::onlyRead : Kind::noContainer};
     return {};
 }
 

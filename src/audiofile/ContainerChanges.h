@@ -7,7 +7,7 @@
 #include "platform/core/Bytes.h"
 #include "platform/core/FourCC.h"
 
-/// Opens a file with chunks. Problems: status, empty, noContainer.
+/// Opens a file that takes chunks. Problems: status, empty, noContainer, onlyRead.
 KT_EXPORT ContainerProblem OpenContainer(CAudioFileIO& file, const CFileRef& ref, unsigned int mode);
 
 /// Removes every chunk of the id, which must be `count`. Problems: those of OpenContainer, chunks, notRemoved.

@@ -1,7 +1,7 @@
 #include "audiofile/ContainerEditor.h"
 
-#include "audiofile/ContainerWalk.h"
-#include "files/CFileIO.h"
+#include "audiofile/FileWindow.h"
+#include "media/containers/ChunkWalk.h"
 
 #include <algorithm>
 #include <array>
@@ -9,6 +9,9 @@
 #include <new>
 
 namespace {
+
+using platform::ChunkWalk;
+using platform::WalkPolicy;
 
 constexpr std::uint32_t kSizeElsewhere = 0xFFFFFFFF; // in the "ds64"
 constexpr std::int64_t kLargestFORM = 0x7FFFFFFF;    // sizes are signed
@@ -28,7 +31,7 @@ std::int32_t unlessUnreadable(const FileWindow& window, std::int32_t status)
 
 /// The chunk behind which a new one goes.
 struct ContainerEditor::LastChunk {
-    WalkedChunk chunk;
+    platform::WalkedChunk chunk;
     std::int64_t insertion = 0;
     std::int64_t dataSize = 0; // of the chunk "data"
 };
@@ -59,16 +62,17 @@ std::int32_t ContainerEditor::appendToContainer(FourCC id, BytesView body)
     if (const std::int32_t status = file_.GetEOF(&length); status != kStatusOK)
         return status;
     FileWindow window(file_, length);
-    if (ChunkedContainerKind(window) == 0)
-        return unlessUnreadable(window, kNoChunkedContainer);
-    ContainerChkExtended header;
-    if (ReadContainerHeader(window, header) != kStatusOK)
-        return kHeaderUnreadable;
-    if (ContainerEnd(header, window.length()) < 0)
+    ChunkWalk walk(window, WalkPolicy::asStated);
+    if (walk.begin() != kStatusOK)
+        return walk.container().traits != nullptr ? kHeaderUnreadable : unlessUnreadable(window, kNoChunkedContainer);
+    if (!walk.container().traits->isEditable)
+        return kNoChunkedContainer;
+    if (walk.statedEnd() < 0)
         return kStatusEndOfFile;
     LastChunk last;
-    if (const std::int32_t status = findLastChunk(window, header, last); status != kStatusOK)
+    if (const std::int32_t status = findLastChunk(walk, last); status != kStatusOK)
         return status;
+    ContainerChkExtended header = walk.container().header;
 
     const ContainerChkExtended before = header;
     const auto size = static_cast<std::int64_t>(body.size());
@@ -98,31 +102,28 @@ std::int32_t ContainerEditor::appendToContainer(FourCC id, BytesView body)
 
 /// Kept: the container's size decides which chunk is the last, so that in a recording that was cut short, whose size is
 /// still 0, a new chunk goes over the samples; callers who may meet one look before.
-std::int32_t ContainerEditor::findLastChunk(FileWindow& window, const ContainerChkExtended& header,
-                                            LastChunk& last) const
+std::int32_t ContainerEditor::findLastChunk(ChunkWalk& walk, LastChunk& last)
 {
-    const std::int64_t end = ContainerEnd(header, window.length());
-    const std::int32_t status = WalkChunks(window, header, end, [&](const WalkedChunk& chunk) {
-        last.chunk = chunk;
-        last.insertion = std::min(chunk.next, window.length());
-        if (chunk.header.id == kData)
-            last.dataSize = chunk.size;
-        return true;
-    });
-    return status == kFirstChunkUnreadable ? kChunkHeaderFailed : status;
+    while (walk.next()) {
+        last.chunk = walk.chunk();
+        last.insertion = walk.following();
+        if (last.chunk.id == kData)
+            last.dataSize = last.chunk.size;
+    }
+    return walk.status();
 }
 
 /// Repairs a last chunk whose size is stale.
 std::int32_t ContainerEditor::storeLastSize(LastChunk& last, ContainerChkExtended& header)
 {
-    ChkHeader& chunk = last.chunk.header;
-    const std::int64_t body = last.chunk.position + std::int64_t{sizeof(ChkHeader)};
+    ChkHeader chunk{last.chunk.id, last.chunk.field};
+    const auto body = static_cast<std::int64_t>(last.chunk.body);
     std::int64_t extent = 0;
     const bool overflows = __builtin_add_overflow(body + padOf(last.chunk.size), last.chunk.size, &extent);
     if (!overflows && extent == last.insertion)
         return kStatusOK;
     chunk.SetSize(last.insertion - body, header);
-    return writeChunkHeader(last.chunk.position, chunk, header);
+    return writeChunkHeader(static_cast<std::int64_t>(last.chunk.position), chunk, header);
 }
 
 /// Pieces that follow each other in the file, in one system call when they are small.
@@ -183,14 +184,15 @@ std::int32_t ContainerEditor::writeContainerHeader(ContainerChkExtended header)
 std::int32_t ContainerEditor::storeSizesOutright(const ContainerChkExtended& header)
 {
     FileWindow window(file_, file_.GetEOF());
-    std::int32_t status = kStatusOK;
-    WalkChunks(window, header, ContainerEnd(header, window.length()), [&](const WalkedChunk& chunk) {
-        if (chunk.header.size == kSizeElsewhere && chunk.size >= 0 && chunk.size < kSizeElsewhere) {
-            const ChkHeader outright{chunk.header.id, static_cast<std::uint32_t>(chunk.size)};
-            status = writeChunkHeader(chunk.position, outright, header);
+    ChunkWalk walk(window, WalkPolicy::asStated);
+    std::int32_t status = walk.begin();
+    while (status == kStatusOK && walk.next()) {
+        const platform::WalkedChunk& chunk = walk.chunk();
+        if (chunk.field == kSizeElsewhere && chunk.size >= 0 && chunk.size < kSizeElsewhere) {
+            const ChkHeader outright{chunk.id, static_cast<std::uint32_t>(chunk.size)};
+            status = writeChunkHeader(static_cast<std::int64_t>(chunk.position), outright, header);
         }
-        return status == kStatusOK;
-    });
+    }
     return unlessUnreadable(window, status);
 }
 
@@ -203,10 +205,10 @@ std::int32_t ContainerEditor::remove(FourCC id)
         return status;
     FileWindow window(file_, length);
     ContainerChkExtended header;
-    if (ReadContainerHeader(window, header) != kStatusOK)
+    if (platform::readContainerHeader(window, header) != kStatusOK)
         return kHeaderUnreadable;
     std::vector<Extent> found;
-    if (const std::int32_t status = findAll(window, id, header, found); status != kStatusOK || found.empty())
+    if (const std::int32_t status = findAll(window, id, found); status != kStatusOK || found.empty())
         return status;
     if (!file_.IsOpenForWriting())
         return kStatusNotOpen;
@@ -228,31 +230,21 @@ std::int32_t ContainerEditor::remove(FourCC id)
 
 /// In file order. A chunk that has not all of its bytes is not removed; of a container other than CAF, none is then.
 /// The status of a read that failed: behind an unreadable header the hole would seem to reach to the end of the file.
-std::int32_t ContainerEditor::findAll(FileWindow& window, FourCC id, const ContainerChkExtended& header,
-                                      std::vector<Extent>& found) const
+std::int32_t ContainerEditor::findAll(FileWindow& window, FourCC id, std::vector<Extent>& found) const
 {
+    ChunkWalk walk(window, WalkPolicy::asStated);
+    if (walk.begin() != kStatusOK || !walk.container().traits->isEditable)
+        return window.failure();
     bool isComplete = true;
-    if (isCAF()) {
-        WalkCAFChunks(window, [&](FourCC chunkId, std::int64_t position, std::int64_t size) {
-            const std::int64_t body = position + std::int64_t{sizeof(CAFChunkHeader)};
-            isComplete = size <= window.length() - body;
-            if (chunkId == id && size > 0 && isComplete)
-                found.push_back({position, body + size});
-            return isComplete;
-        });
-        return window.failure();
+    while ((isComplete || !isCAF()) && walk.next()) {
+        const platform::WalkedChunk& chunk = walk.chunk();
+        const bool isWanted = chunk.id == id && (!isCAF() || chunk.size > 0);
+        if (isWanted || isCAF())
+            isComplete = chunk.hasItsBytes(window.length()) || (isCAF() && chunk.size < 0);
+        if (isWanted && (isComplete || !isCAF()))
+            found.push_back({static_cast<std::int64_t>(chunk.position), walk.following()});
     }
-    if (ChunkedContainerKind(window) == 0)
-        return window.failure();
-    WalkChunks(window, header, ContainerEnd(header, window.length()), [&](const WalkedChunk& chunk) {
-        if (chunk.header.id == id) {
-            found.push_back({chunk.position, chunk.next});
-            isComplete =
-                chunk.size >= 0 && chunk.size <= window.length() - chunk.position - std::int64_t{sizeof chunk.header};
-        }
-        return true;
-    });
-    if (!isComplete)
+    if (!isComplete && !isCAF())
         found.clear();
     return window.failure();
 }

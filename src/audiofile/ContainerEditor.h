@@ -13,6 +13,10 @@
 class CFileIO;
 class FileWindow;
 
+namespace platform {
+class ChunkWalk;
+}
+
 /// Owns neither the file nor its description, which it keeps true where an edit moves the samples or changes the
 /// length.
 class ContainerEditor {
@@ -43,7 +47,7 @@ private:
 
     std::int32_t appendToCAF(FourCC id, BytesView body);
     std::int32_t appendToContainer(FourCC id, BytesView body);
-    std::int32_t findLastChunk(FileWindow& window, const ContainerChkExtended& header, LastChunk& last) const;
+    static std::int32_t findLastChunk(platform::ChunkWalk& walk, LastChunk& last);
     std::int32_t storeLastSize(LastChunk& last, ContainerChkExtended& header);
     std::int32_t writeTogether(std::int64_t position, std::span<const BytesView> pieces);
     std::int32_t writeApart(std::int64_t position, std::span<const BytesView> pieces);
@@ -52,8 +56,7 @@ private:
     std::int32_t writeContainerHeader(ContainerChkExtended header);
     std::int32_t storeSizesOutright(const ContainerChkExtended& header);
 
-    std::int32_t findAll(FileWindow& window, FourCC id, const ContainerChkExtended& header,
-                         std::vector<Extent>& found) const;
+    std::int32_t findAll(FileWindow& window, FourCC id, std::vector<Extent>& found) const;
     std::int32_t cutOut(const std::vector<Extent>& holes);
     std::int32_t movePiece(std::int64_t from, std::int64_t to, std::int64_t count);
     std::int32_t shrink(ContainerChkExtended header, const std::vector<Extent>& holes);

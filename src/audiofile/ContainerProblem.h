@@ -13,6 +13,7 @@ struct [[nodiscard]] ContainerProblem {
         status,      // a call of the library failed
         empty,       // the file is
         noContainer, // that is known
+        onlyRead,    // its kind is (RIFX, Wave64)
         chunks,      // cannot be walked
         reading,     // bodies cannot be read to compare them
         adding,      // CAudioFileIO::AddChunk gave `status`, the system `systemError`

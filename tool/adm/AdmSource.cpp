@@ -82,7 +82,7 @@ std::optional<Bytes> AdmSource::trackChunk()
     const ChunkSurvey survey = isAudio_ ? surveyChunks(file_, fourCC("chna")) : ChunkSurvey();
     if (!survey.found)
         return std::nullopt;
-    const std::int64_t offset = ChunkBodyOffset(*survey.found, survey.extent);
+    const std::int64_t offset = survey.found->body;
     const std::int64_t there = std::min(survey.found->size, survey.extent.fileLength - offset);
     Bytes body(static_cast<std::size_t>(std::clamp<std::int64_t>(there, 0, largest)));
     requireOK(file_.Read(body.data(), offset, static_cast<long>(body.size()), nullptr));

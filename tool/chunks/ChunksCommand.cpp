@@ -97,7 +97,7 @@ void listFile(const std::string& path, ChunkListWriter& writer, bool quiet)
 {
     const FileAccess access = accessForReading(path, {.quiet = quiet});
     CAudioFileIO file;
-    openContainer(file, path, 0);
+    openChunks(file, path);
     ContainerExtent extent;
     bool begun = false;
     const std::int32_t status = file.ForEachChunk(

@@ -93,7 +93,7 @@ void getChunk(const GetArguments& arguments, const OutputOptions& options)
     if (!arguments.sidecar.empty())
         return getFromAnywhere(arguments, options);
     CAudioFileIO file;
-    openContainer(file, arguments.file, 0);
+    openChunks(file, arguments.file);
     const ChunkBody chunk = requireChunk(file, arguments.id);
     const std::string id = fourCCText(arguments.id);
     put([&](const Sink& sink) { copyBody(file, chunk.offset, chunk.size, options.quiet, sink); }, arguments);

@@ -126,7 +126,7 @@ bool keepsItsChunks(const std::string& path)
 {
     CAudioFileIO file;
     requireOK(file.OpenForChunks(referenceTo(path), 0));
-    return file.HasChunks();
+    return file.TakesChunks();
 }
 
 SidecarChunk readFromAnywhere(const std::string& path, FourCC id, const std::string& extension)

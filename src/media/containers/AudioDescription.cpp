@@ -1,94 +1,226 @@
 #include "media/containers/AudioDescription.h"
 
-#include "media/containers/StoredFormat.h"
-#include "platform/core/Packed.h"
+#include "media/containers/ChannelLayouts.h"
+#include "platform/core/ByteReader.h"
 #include "platform/core/Status.h"
 
 #include <algorithm>
+#include <array>
 
 namespace platform {
 
 namespace {
 
-/// The first bytes of a chunk's body, at most `most`; empty when it has fewer than `least`.
-Bytes bodyOf(const BodyReader& readBody, const Chunk* chunk, std::size_t least, std::size_t most)
+/// Whether data are blocks of ADPCM as they should be, the last one too: of others it is the decoder that says how many
+/// frames they hold.
+bool areWholeBlocks(const StoredFormat& format, std::uint64_t dataSize)
 {
-    if (chunk == nullptr || chunk->size < least)
-        return {};
-    Bytes body(static_cast<std::size_t>(std::min<std::uint64_t>(chunk->size, most)));
-    if (readBody(*chunk, body.data(), body.size()) != kStatusOK)
-        return {};
-    return body;
-}
-
-std::optional<StoredFormat> readFormat(const BodyReader& readBody, const ContainerLayout& layout)
-{
-    const auto body = [&](FourCC id) { return bodyOf(readBody, layout.find(id), 0, kMostOfStoredFormat); };
-    switch (layout.kind) {
-    case ContainerKind::riff:
-    case ContainerKind::wave64:
-        return storedFormatOfWAVE(body(fourCC("fmt ")), layout.order());
-    case ContainerKind::iff:
-        return storedFormatOfAIFF(body(fourCC("COMM")), layout.fileType == fourCC("AIFC"));
-    case ContainerKind::caf:
-        return storedFormatOfCAF(body(fourCC("desc")));
-    case ContainerKind::au:
-        return storedFormatOfAU(body(fourCC(".snd")));
-    case ContainerKind::rex2:
-        break;
-    }
-    return std::nullopt;
-}
-
-/// The packets that a CAF file of packets in differing sizes counts in its packet table.
-std::uint64_t packetsOfTable(const BodyReader& readBody, const ContainerLayout& layout)
-{
-    const Bytes body = bodyOf(readBody, layout.find(fourCC("pakt")), 24, 24);
-    return body.empty() ? 0 : static_cast<std::uint64_t>(std::max<std::int64_t>(0, loadBE<std::int64_t>(body.data())));
-}
-
-/// Finds the samples in "data" or "SSND". AIFF that counts no frames need have none.
-std::int32_t locateData(const BodyReader& readBody, const ContainerLayout& layout, const StoredFormat& format,
-                        AudioDescription& description)
-{
-    constexpr std::uint64_t editCountSize = 4;
-    const Chunk* data = layout.find(layout.audioDataId());
-    if (data == nullptr)
-        return layout.kind == ContainerKind::iff && format.countedPackets == 0 ? kStatusOK : kStatusIOError;
-    std::uint64_t lead = 0; // ahead of the samples, in the body
-    if (layout.kind == ContainerKind::caf)
-        lead = std::min(editCountSize, data->size);
-    if (layout.kind == ContainerKind::iff)
-        lead = soundDataLead(data->size, bodyOf(readBody, data, 4, 4));
-    description.dataOffset = layout.bodyOf(*data) + lead;
-    description.byteCount = data->size - lead;
-    return kStatusOK;
+    constexpr FourCC microsoft = fourCC('m', 's', 0, 2);
+    const StreamDescription& stream = format.stream;
+    const std::uint64_t channels = stream.channelsPerFrame, bytes = stream.bytesPerPacket;
+    // A block begins with a few bytes for each channel, which hold one frame, or two.
+    const std::uint64_t headerSize = (format.coding == microsoft ? 7 : 4) * channels;
+    const std::uint64_t inHeader = format.coding == microsoft ? 2 : 1;
+    return channels > 0 && bytes > headerSize && dataSize % bytes == 0 && stream.bitsPerChannel == 4 &&
+           stream.framesPerPacket == (bytes - headerSize) * 2 / channels + inHeader;
 }
 
 } // namespace
 
-std::int32_t describeAudio(const BodyReader& readBody, const ContainerLayout& layout, AudioDescription& description)
+std::uint64_t AudioDescription::byteCount() const
 {
-    description = {};
-    const auto stored = readFormat(readBody, layout);
-    if (!stored)
-        return kStatusIOError;
-    const StreamDescription& format = description.format = stored->stream;
-    if (format.channelsPerFrame == 0 || (format.isLinearPCM() && format.bytesPerPacket == 0))
-        return kStatusIOError;
-    if (const std::int32_t located = locateData(readBody, layout, *stored, description); located != kStatusOK)
-        return located;
-    const std::uint64_t counted = stored->countedPackets;
-    if (format.bytesPerPacket > 0) {
-        description.packetCount = description.byteCount / format.bytesPerPacket;
-        if (counted > 0 && counted < description.packetCount && format.isLinearPCM()) {
-            description.packetCount = counted;
-            description.byteCount = counted * format.bytesPerPacket;
-        }
-    } else {
-        description.packetCount = layout.kind == ContainerKind::caf ? packetsOfTable(readBody, layout) : counted;
+    const std::uint64_t counted = format->countedPackets, packetSize = stream().bytesPerPacket;
+    const bool countsFewer = stream().isLinearPCM() && counted > 0 && packetSize > 0 && counted < dataSize / packetSize;
+    return countsFewer ? counted * packetSize : dataSize;
+}
+
+bool AudioDescriber::isLikeWAVE() const
+{
+    return container_.traits->formatId == fourCC("fmt ");
+}
+
+void AudioDescriber::meet(const WalkedChunk& chunk)
+{
+    const ContainerTraits& traits = *container_.traits;
+    if (chunk.id == traits.formatId && !metFormat_)
+        readFormat(chunk);
+    else if (chunk.id == traits.soundId && !found_.hasSound)
+        locateSound(chunk);
+    else if (chunk.id == fourCC("fact") && isLikeWAVE() && !factFrames_ && !isComplete()) {
+        std::array<std::byte, 4> frames;
+        if (window_.read(frames.data(), chunk.body, frames.size()) == kStatusOK)
+            factFrames_ = load<std::uint32_t>(frames.data(), traits.order);
+    } else if (traits.kind == ContainerKind::caf && chunk.id == fourCC("pakt") && !packetTable_)
+        readPacketTable(chunk);
+    else if (traits.kind == ContainerKind::caf && chunk.id == fourCC("chan"))
+        readLayout(chunk);
+}
+
+/// A packet table may stand behind the data that it tells of.
+bool AudioDescriber::isComplete() const
+{
+    return metFormat_ && found_.hasSound &&
+           (container_.traits->kind != ContainerKind::caf || !found_.format || found_.stream().isLinearPCM() ||
+            packetTable_);
+}
+
+void AudioDescriber::readFormat(const WalkedChunk& chunk)
+{
+    metFormat_ = true;
+    std::array<std::byte, kMostOfStoredFormat> bytes;
+    const auto wanted = static_cast<std::size_t>(std::clamp<std::int64_t>(chunk.size, 0, std::int64_t{bytes.size()}));
+    const std::size_t there = window_.readSome(bytes.data(), chunk.body, wanted);
+    found_.format = container_.traits->readFormat(BytesView(bytes).first(there), container_.formType);
+}
+
+void AudioDescriber::locateSound(const WalkedChunk& chunk)
+{
+    constexpr std::uint64_t editCountSize = 4; // of CAF
+    constexpr std::int64_t toTheEnd = INT64_MAX;
+    const auto size = static_cast<std::uint64_t>(chunk.size);
+    const std::uint64_t there = std::min(size, window_.length() - chunk.body);
+    std::uint64_t lead = 0; // ahead of the samples, in the body
+    if (container_.traits->kind == ContainerKind::caf)
+        lead = std::min(editCountSize, there);
+    if (container_.traits->kind == ContainerKind::iff) {
+        std::array<std::byte, 4> start;
+        const std::size_t got = window_.readSome(start.data(), chunk.body, start.size());
+        lead = soundDataLead(there, BytesView(start).first(got));
     }
-    return kStatusOK;
+    found_.hasSound = true;
+    found_.dataOffset = chunk.body + lead;
+    found_.dataSize = there - lead;
+    found_.missingDataSize = chunk.size == toTheEnd ? 0 : size - there;
+}
+
+void AudioDescriber::readPacketTable(const WalkedChunk& chunk)
+{
+    std::array<std::byte, 24> bytes;
+    if (window_.read(bytes.data(), chunk.body, bytes.size()) != kStatusOK)
+        return;
+    ByteReader reader(bytes);
+    packetTable_.emplace();
+    packetTable_->packets = reader.read<std::int64_t>();
+    packetTable_->frames = reader.read<std::int64_t>();
+}
+
+/// Only a bitmap tells the order of the channels, too.
+void AudioDescriber::readLayout(const WalkedChunk& chunk)
+{
+    constexpr std::uint32_t byBitmap = 0x10000;
+    std::array<std::byte, 8> bytes;
+    speakers_ = found_.layout = 0;
+    if (!window_.get(bytes, chunk.body))
+        return;
+    const auto tag = loadBE<std::uint32_t>(bytes.data());
+    const auto bitmap = loadBE<std::uint32_t>(bytes.data() + 4);
+    found_.layout = speakersOfLayout(tag, bitmap);
+    speakers_ = tag == byBitmap ? bitmap : 0;
+}
+
+AudioDescription AudioDescriber::description() const
+{
+    AudioDescription description = found_;
+    if (!description.format)
+        return description;
+    if (container_.traits->kind == ContainerKind::caf)
+        description.format->speakers = speakers_;
+    else
+        description.layout = description.format->speakers.value_or(0);
+    count(description);
+    return description;
+}
+
+void AudioDescriber::count(AudioDescription& description) const
+{
+    const StreamDescription& stream = description.stream();
+    const std::uint64_t counted = description.format->countedPackets;
+    const std::uint64_t there = stream.bytesPerPacket > 0 ? description.dataSize / stream.bytesPerPacket : 0;
+    if (stream.bytesPerPacket > 0)
+        description.packetCount = there;
+    else if (container_.traits->kind == ContainerKind::caf)
+        description.packetCount =
+            packetTable_ ? static_cast<std::uint64_t>(std::max<std::int64_t>(packetTable_->packets, 0)) : 0;
+    else
+        description.packetCount = counted;
+
+    if (stream.isLinearPCM()) {
+        // Of AIFF what the file counts, where that is there; a count of 0 with samples behind it was never filled in.
+        if (counted > 0)
+            description.packetCount = std::min(counted, there);
+        description.frames = description.packetCount;
+    } else if (container_.traits->kind == ContainerKind::caf) {
+        countPacketsOfCAF(description);
+    } else if (container_.traits->kind == ContainerKind::iff) {
+        // Packets of one size are those that are there: some writers count frames, or the packets of all channels as
+        // one.
+        description.framesAreStated = stream.bytesPerPacket == 0;
+        description.frames = description.framesAreStated ? counted : there * stream.framesPerPacket;
+    } else {
+        countBlocks(description);
+    }
+}
+
+/// Frames of compressed data in WAVE and its kin. A "fact" is believed when its frames need the blocks that are there,
+/// where their size is known: some writers count the frames of IMA ADPCM once for all channels.
+void AudioDescriber::countBlocks(AudioDescription& description) const
+{
+    const StreamDescription& stream = description.stream();
+    const std::uint64_t framesPerBlock = stream.framesPerPacket;
+    const std::uint64_t blocks = stream.bytesPerPacket > 0 ? description.packetCount : 0;
+    const std::uint64_t inBlocks = blocks * framesPerBlock;
+    const ContainerChkExtended& header = container_.header;
+    const bool isLong = factFrames_ == 0xFFFFFFFFU && header.HasValidDs64();
+    const std::uint64_t said = isLong ? std::uint64_t{header.sampleCount} : factFrames_.value_or(0);
+    description.framesAreStated = inBlocks == 0 || description.missingDataSize > 0 ||
+                                  (framesPerBlock > 1 && !areWholeBlocks(*description.format, description.dataSize));
+    if (description.framesAreStated) { // no more than the blocks can hold, the one that is cut short too
+        const std::uint64_t most =
+            framesPerBlock > 0 && stream.bytesPerPacket > 0 ? inBlocks + framesPerBlock : INT64_MAX;
+        description.frames = factFrames_ ? std::min(said, most) : inBlocks;
+        return;
+    }
+    description.frames = said + framesPerBlock > inBlocks && said < inBlocks ? said : inBlocks;
+}
+
+/// No more frames than the packets hold that can be there, each of a byte at least.
+void AudioDescriber::countPacketsOfCAF(AudioDescription& description) const
+{
+    const StreamDescription& stream = description.stream();
+    const auto packetsThere =
+        static_cast<std::int64_t>(description.dataSize / std::max<std::uint64_t>(stream.bytesPerPacket, 1));
+    const std::int64_t packets =
+        packetTable_ ? std::clamp<std::int64_t>(packetTable_->packets, 0, packetsThere) : packetsThere;
+    std::int64_t capacity = 0;
+    if (stream.framesPerPacket == 0 || __builtin_mul_overflow(packets, std::int64_t{stream.framesPerPacket}, &capacity))
+        capacity = INT64_MAX;
+    const bool isKnown = stream.bytesPerPacket > 0 && stream.framesPerPacket > 0;
+    const std::int64_t frames = packetTable_ ? std::clamp<std::int64_t>(packetTable_->frames, 0, capacity)
+                                : isKnown    ? capacity
+                                             : 0;
+    description.frames = static_cast<std::uint64_t>(frames);
+    description.framesAreStated = true;
+}
+
+std::int32_t describeAudio(HeaderWindow& window, const ContainerLayout& layout, AudioDescription& description)
+{
+    AudioDescriber describer(window, layout.container);
+    for (const Chunk& chunk : layout.chunks) {
+        describer.meet({.id = chunk.id,
+                        .position = chunk.position,
+                        .body = layout.bodyOf(chunk),
+                        .size = static_cast<std::int64_t>(chunk.size)});
+    }
+    description = describer.description();
+    if (window.failure() != kStatusOK)
+        return window.failure();
+    const bool needsSound =
+        layout.kind() != ContainerKind::iff || !description.format || description.format->countedPackets > 0;
+    if (!description.format || (needsSound && !description.hasSound))
+        return kStatusIOError;
+    const StreamDescription& stream = description.stream();
+    const bool isSound = stream.channelsPerFrame > 0 && (!stream.isLinearPCM() || stream.bytesPerPacket > 0);
+    return isSound ? kStatusOK : kStatusIOError;
 }
 
 } // namespace platform

@@ -9,7 +9,6 @@ namespace platform {
 
 namespace {
 
-constexpr std::uint64_t kLargestField = 0xFFFFFFFE; // 0xFFFFFFFF says: look into the "ds64"
 constexpr std::uint64_t kRiffSizeOffset = 20;
 constexpr std::uint64_t kDataSizeOffset = 28;
 
@@ -42,15 +41,15 @@ std::int32_t becomeRF64(const FileBytes& file, const ContainerLayout& layout, st
 
 std::int32_t checkContainerEnd(const ContainerLayout& layout, std::uint64_t end)
 {
-    if (layout.kind == ContainerKind::caf)
+    if (layout.kind() == ContainerKind::caf)
         return kStatusOK;
-    const bool sizes64 = layout.hasSizes64 || layout.hasReservation;
+    const bool sizes64 = layout.hasSizes64() || layout.hasReservation();
     return end - 8 <= layout.largestChunk() || sizes64 ? kStatusOK : kStatusFileTooBig;
 }
 
 std::int32_t writeContainerEnd(const FileBytes& file, const ContainerLayout& layout, std::uint64_t end)
 {
-    if (layout.kind == ContainerKind::caf)
+    if (layout.kind() == ContainerKind::caf)
         return kStatusOK;
     if (const std::int32_t status = checkContainerEnd(layout, end); status != kStatusOK)
         return status;
@@ -58,11 +57,11 @@ std::int32_t writeContainerEnd(const FileBytes& file, const ContainerLayout& lay
     std::array<std::byte, 4> field;
     if (const std::int32_t status = file.read(4, field.data(), field.size()); status != kStatusOK)
         return status;
-    if (layout.hasSizes64 && loadLE<std::uint32_t>(field.data()) == 0xFFFFFFFF)
+    if (layout.hasSizes64() && loadLE<std::uint32_t>(field.data()) == 0xFFFFFFFF)
         return overwriteNumber(file, kRiffSizeOffset, size, std::endian::little);
-    if (size <= kLargestField)
-        return overwriteNumber(file, 4, static_cast<std::uint32_t>(size), layout.order());
-    if (layout.hasReservation)
+    if (size <= layout.largestChunk())
+        return overwriteNumber(file, 4, static_cast<std::uint32_t>(size), layout.container.traits->order);
+    if (layout.hasReservation())
         return becomeRF64(file, layout, size);
     if (const std::int32_t status = overwriteNumber(file, kRiffSizeOffset, size, std::endian::little);
         status != kStatusOK)
@@ -77,16 +76,16 @@ std::int32_t writeLastChunkSize(const FileBytes& file, ContainerLayout& layout, 
     // The "ds64" speaks of the first one; a further one has its own 32 bits.
     const bool isData = layout.find(layout.audioDataId()) == &chunk;
     std::int32_t status = kStatusOK;
-    if (layout.kind == ContainerKind::caf) {
+    if (layout.kind() == ContainerKind::caf) {
         status = overwriteNumber(file, position, size, std::endian::big);
-    } else if (layout.kind == ContainerKind::riff && isData && layout.hasSizes64) {
+    } else if (layout.kind() == ContainerKind::riff && isData && layout.hasSizes64()) {
         // A field that is not 0xFFFFFFFF counts until it becomes so.
         status = overwriteNumber(file, kDataSizeOffset, size, std::endian::little);
         if (status == kStatusOK)
             status = overwriteNumber(file, position, std::uint32_t{0xFFFFFFFF}, std::endian::little);
     } else if (size <= layout.largestChunk()) {
-        status = overwriteNumber(file, position, static_cast<std::uint32_t>(size), layout.order());
-    } else if (isData && layout.hasReservation) {
+        status = overwriteNumber(file, position, static_cast<std::uint32_t>(size), layout.container.traits->order);
+    } else if (isData && layout.hasReservation()) {
         status = overwriteNumber(file, position, std::uint32_t{0xFFFFFFFF}, std::endian::little);
     } else {
         status = kStatusFileTooBig;
@@ -120,7 +119,7 @@ std::int32_t settleLastChunk(const FileBytes& file, ContainerLayout& layout)
 
 bool hasForeignTail(const FileBytes& file, const ContainerLayout& layout)
 {
-    if (layout.kind == ContainerKind::caf || layout.fileLength <= layout.end)
+    if (layout.kind() == ContainerKind::caf || layout.fileLength <= layout.end)
         return false;
     std::array<std::byte, 4> id{};
     return file.read(layout.end, id.data(), id.size()) != kStatusOK ||

@@ -1,6 +1,7 @@
 // The bytes of one open file, read and written whole through the call table.
 #pragma once
 
+#include "media/containers/ByteSource.h"
 #include "platform/SystemCalls.h"
 #include "platform/core/Bytes.h"
 
@@ -10,7 +11,7 @@
 namespace platform {
 
 /// Owns the descriptor. Operations return 0 or a negative status code.
-class FileBytes {
+class FileBytes final : public ByteSource {
 public:
     explicit FileBytes(int descriptor) : descriptor_(descriptor) {}
     ~FileBytes();
@@ -19,7 +20,7 @@ public:
 
     std::int32_t length(std::uint64_t& length) const;
     /// Reads up to `count` bytes; fewer only at the end of the file.
-    std::int32_t readSome(std::uint64_t position, void* to, std::size_t count, std::size_t& got) const;
+    std::int32_t readSome(std::uint64_t position, void* to, std::size_t count, std::size_t& got) const override;
     /// Reads all of them; kStatusEndOfFile when the file is shorter.
     std::int32_t read(std::uint64_t position, void* to, std::size_t count) const;
     std::int32_t write(std::uint64_t position, const void* from, std::size_t count) const;

@@ -1,12 +1,13 @@
-// A window on the bytes of an open file: chunk headers, and the small chunks beside them, are read through it, so that
-// a file of tiny chunks costs few calls.
+// A window on the bytes of an open file: headers, and the small chunks beside them, are read through it, so that those
+// which lie together cost one call, however often they are asked for.
 #pragma once
 
-#include "media/containers/FileBytes.h"
+#include "media/containers/ByteSource.h"
 #include "platform/core/Status.h"
 
 #include <algorithm>
 #include <array>
+#include <cstring>
 
 namespace platform {
 
@@ -14,23 +15,27 @@ namespace platform {
 /// samples stand. Does not own the file; what is written to it meanwhile is not seen.
 class HeaderWindow {
 public:
-    HeaderWindow(const FileBytes& file, std::uint64_t length) : file_(file), length_(length) {}
+    /// What at() can be asked for.
+    static constexpr std::size_t kMostAtOnce = 2048;
+
+    /// `length` is that of the file, asked for once.
+    HeaderWindow(const ByteSource& file, std::uint64_t length) : file_(file), length_(length) {}
 
     std::uint64_t length() const { return length_; }
-    /// That of the first read that failed.
-    std::int32_t status() const { return status_; }
+    /// That of the first read that failed; kStatusOK until then. A file whose bytes cannot be read has not ended.
+    std::int32_t failure() const { return failure_; }
+    /// Why at() gave nothing, or read() not all, the last time: kStatusEndOfFile, or that of the read that failed.
+    std::int32_t reason() const { return reason_; }
 
-    /// `count` bytes at `position`, at most 4,096, there until the next call; null when the file ends ahead of them,
-    /// and when they cannot be read.
+    /// `count` bytes at `position`, there until the next call; null when the file ends ahead of them, and when they
+    /// cannot be read.
     const std::byte* at(std::uint64_t position, std::size_t count)
     {
+        reason_ = kStatusEndOfFile;
         if (position > length_ || count > length_ - position)
             return nullptr;
-        const bool isStart = position + count <= kPieceSize;
-        Piece& piece = isStart ? start_ : elsewhere_;
-        if (piece.find(position, count) == nullptr)
-            load(piece, isStart ? 0 : position);
-        return piece.find(position, count);
+        const bool isAtStart = position + count <= kStartSize;
+        return isAtStart ? start_.at(*this, 0, position, count) : elsewhere_.at(*this, position, position, count);
     }
 
     /// The same of what was read already; null when it was not.
@@ -40,9 +45,35 @@ public:
         return found != nullptr ? found : elsewhere_.find(position, count);
     }
 
-private:
-    static constexpr std::size_t kPieceSize = 4096;
+    /// Copies as many of the bytes as are there, and returns their number: fewer at the file's end, and on a failure.
+    std::size_t readSome(void* to, std::uint64_t position, std::size_t count)
+    {
+        reason_ = kStatusEndOfFile;
+        if (position >= length_)
+            return 0;
+        const auto there = static_cast<std::size_t>(std::min<std::uint64_t>(count, length_ - position));
+        std::size_t done = 0;
+        while (done < there) {
+            const std::size_t step = std::min(there - done, kMostAtOnce);
+            const std::byte* bytes = at(position + done, step);
+            if (bytes == nullptr)
+                break;
+            std::memcpy(static_cast<std::byte*>(to) + done, bytes, step);
+            done += step;
+        }
+        return done;
+    }
 
+    /// All of the bytes; kStatusEndOfFile when they are not all there; else the status of the read that failed.
+    std::int32_t read(void* to, std::uint64_t position, std::size_t count)
+    {
+        return readSome(to, position, count) == count ? std::int32_t{kStatusOK} : reason_;
+    }
+
+private:
+    static constexpr std::size_t kStartSize = 4096; // most headers end within it, also those padded to a page
+
+    template <std::size_t Capacity>
     struct Piece {
         const std::byte* find(std::uint64_t position, std::size_t count) const
         {
@@ -50,25 +81,38 @@ private:
                 return nullptr;
             return bytes.data() + (position - start);
         }
+        /// Reads anew from `from` on when they are not all here.
+        const std::byte* at(HeaderWindow& window, std::uint64_t from, std::uint64_t position, std::size_t count)
+        {
+            if (const std::byte* found = find(position, count)) [[likely]]
+                return found;
+            window.load(bytes.data(), from, Capacity, size);
+            start = from;
+            return find(position, count);
+        }
 
         std::uint64_t start = 0;
         std::size_t size = 0;
-        std::array<std::byte, kPieceSize> bytes; // filled up to size
+        std::array<std::byte, Capacity> bytes; // filled up to size
     };
 
-    void load(Piece& piece, std::uint64_t from)
+    void load(std::byte* to, std::uint64_t from, std::size_t capacity, std::size_t& got)
     {
-        piece.start = from;
-        const auto count = static_cast<std::size_t>(std::min<std::uint64_t>(kPieceSize, length_ - from));
-        const std::int32_t result = file_.readSome(from, piece.bytes.data(), count, piece.size);
-        if (status_ == kStatusOK)
-            status_ = result;
+        const auto count = static_cast<std::size_t>(std::min<std::uint64_t>(capacity, length_ - from));
+        const std::int32_t status = file_.readSome(from, to, count, got);
+        if (status == kStatusOK)
+            return;
+        reason_ = status;
+        if (failure_ == kStatusOK)
+            failure_ = status;
     }
 
-    const FileBytes& file_;
+    const ByteSource& file_;
     std::uint64_t length_;
-    std::int32_t status_ = kStatusOK;
-    Piece start_, elsewhere_;
+    std::int32_t reason_ = kStatusEndOfFile;
+    std::int32_t failure_ = kStatusOK;
+    Piece<kStartSize> start_;
+    Piece<kMostAtOnce> elsewhere_;
 };
 
 } // namespace platform

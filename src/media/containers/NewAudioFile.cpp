@@ -1,4 +1,6 @@
-#include "media/containers/AudioDescription.h"
+#include "media/containers/NewAudioFile.h"
+
+#include "media/containers/ContainerLayout.h"
 #include "media/containers/ExtendedFloat.h"
 #include "platform/core/ByteWriter.h"
 

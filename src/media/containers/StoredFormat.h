@@ -4,6 +4,7 @@
 // draft of 1991-08-26, of CAF the published format description, version 1.0, and of AU the manual page audio(4).
 #pragma once
 
+#include "media/containers/ContainerTraits.h"
 #include "media/samples/StreamDescription.h"
 #include "platform/core/Bytes.h"
 
@@ -13,9 +14,6 @@
 
 namespace platform {
 
-/// Wave64 and AU are only read; of REX2 only the chunks are known.
-enum class ContainerKind : std::uint8_t { riff, iff, caf, wave64, au, rex2 };
-
 struct StoredFormat {
     /// Of linear PCM bytesPerFrame is what a frame takes, 0 where that cannot be; samples fill their bytes from the
     /// top. Of other codings packets and their frames, 0 where they differ.
@@ -24,7 +22,7 @@ struct StoredFormat {
     /// format has the tag that its GUID stands for, 0xFFFE where it stands for none.
     FourCC coding = 0;
     std::uint64_t countedPackets = 0;      // in AIFF; 0 also where nobody filled it in
-    std::optional<std::uint32_t> speakers; // in extensible WAVE: a bit for each
+    std::optional<std::uint32_t> speakers; // in extensible WAVE and CAF: a bit for each, 0 where it does not say
     std::uint32_t validBits = 0; // in extensible WAVE: of a sample's those that count; 0 where it does not say
 };
 

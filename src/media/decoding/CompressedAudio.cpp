@@ -10,7 +10,6 @@
 
 #include <algorithm>
 #include <string_view>
-#include <type_traits>
 
 namespace platform {
 
@@ -27,13 +26,10 @@ constexpr std::string_view kFrame = "\xFF\xF6"; // sync and layer of an MPEG fra
 constexpr Beginning kBeginnings[] = {
     {0, "OggS", fourCC("ogg ")},
     {0, "\x30\x26\xB2\x75", fourCC("asf ")}, // by the start of its identifier
-    {0, ".snd", fourCC("NeXT")},
     {0, "wvpk", fourCC("wvpk")},
     {0, "MAC ", fourCC("ape ")},
     {0, "TTA1", fourCC("tta ")},
     {0, "tBaK", fourCC("tak ")},
-    {0, "riff\x2E\x91\xCF\x11", fourCC("W64f")},
-    {0, "RIFX", fourCC("RIFX")},
     {0, "\x1A\x45\xDF\xA3", fourCC("mkv ")},
     {0, "\x0B\x77", fourCC("ac-3")},
     {0, "fLaC", fourCC("flac")},             // behind a tag
@@ -125,22 +121,16 @@ Bytes startBehindTags(const URL& url, BytesView start)
     return {bytes.begin(), bytes.end()};
 }
 
-/// What the open file says of itself, where it does: its type as the decoder names it, and where linear PCM stands.
-void setFromFile(ConvertingReader& reader, CompressedAudio& audio)
+/// The file's type as the decoder names it, where it does.
+FourCC typeOfOpenFile(ConvertingReader& reader)
 {
     AudioHandle* file = nullptr;
     std::uint32_t size = sizeof file;
     if (reader.property(ConvertingReader::audioFileProperty, size, &file) != kStatusOK || file == nullptr)
-        return;
-    const auto read = [&](FourCC id, auto& value) {
-        std::uint32_t valueSize = sizeof value;
-        std::remove_reference_t<decltype(value)> found = 0;
-        if (file->property(id, valueSize, &found) == kStatusOK && found != 0)
-            value = found;
-    };
-    read(AudioFile::fileTypeProperty, audio.fileType);
-    read(AudioFile::dataOffsetProperty, audio.dataOffset);
-    read(AudioFile::byteCountProperty, audio.byteCount);
+        return 0;
+    FourCC type = 0;
+    size = sizeof type;
+    return file->property(AudioFile::fileTypeProperty, size, &type) == kStatusOK ? type : 0;
 }
 
 } // namespace
@@ -167,7 +157,8 @@ std::int32_t describeCompressedAudio(const URL& url, BytesView start, Compressed
         return kStatusParameterError;
     const auto reader = ConvertingReader::open(url, &status);
     if (reader) {
-        setFromFile(*reader, audio);
+        if (const FourCC type = typeOfOpenFile(*reader); type != 0)
+            audio.fileType = type;
         audio.format = reader->fileFormat();
         audio.format.sampleRate = reader->clientFormat().sampleRate;
         audio.format.channelsPerFrame = reader->clientFormat().channelsPerFrame;

@@ -1,5 +1,5 @@
-// What audio files say of themselves that stand in none of the containers that the library edits: Wave64, AU, RIFX,
-// MP3, AAC, M4A, and whatever else the decoder module reads.
+// What audio files say of themselves that stand in none of the library's containers: MP3, AAC, M4A, and whatever else
+// the decoder module reads.
 #pragma once
 
 #include "media/samples/SoundFacts.h"
@@ -16,9 +16,6 @@ struct CompressedAudio {
     StreamDescription format; // rate and channels are those of the frames that decoding gives
     std::uint64_t frames = 0;
     SoundFacts facts;
-    // Of linear PCM in a container that the library reads itself where its bytes stand; else 0.
-    std::uint64_t dataOffset = 0;
-    std::uint64_t byteCount = 0;
 };
 
 /// Where the library finds the packets itself, in MP3, ADTS, MP4 and CAF files, and knows their frames exactly: the

@@ -48,19 +48,18 @@ std::unique_ptr<PacketSource> CAFPackets::open(std::unique_ptr<PacketFile>& file
 
 std::int32_t CAFPackets::readChunks()
 {
+    HeaderWindow window(file_->bytes(), file_->length());
     ContainerLayout layout;
-    if (const std::int32_t status = scanChunks(file_->bytes(), layout); status != kStatusOK)
-        return status;
-    const BodyReader readBody = [&](const Chunk& chunk, void* to, std::size_t count) {
-        return file_->bytes().read(layout.bodyOf(chunk), to, count);
-    };
+    std::int32_t status = scanChunks(window, layout);
     AudioDescription audio;
-    std::int32_t status = describeAudio(readBody, layout, audio);
-    format_ = audio.format;
-    if (status == kStatusOK && (format_.isLinearPCM() || format_.framesPerPacket == 0))
-        status = AudioHandle::kFormatNotSupported;
     if (status == kStatusOK)
-        status = readCookie(layout);
+        status = describeAudio(window, layout, audio);
+    if (status != kStatusOK)
+        return status;
+    format_ = audio.stream();
+    if (format_.isLinearPCM() || format_.framesPerPacket == 0)
+        return AudioHandle::kFormatNotSupported;
+    status = readCookie(layout);
     if (status == kStatusOK)
         status = readPackets(layout, audio);
     return status == kStatusOK ? checkCoding() : status;
@@ -108,7 +107,7 @@ std::int32_t CAFPackets::readPackets(const ContainerLayout& layout, const AudioD
         if (const std::int32_t status = readSizes(start, layout.bodyOf(*chunk) + chunk->size, count);
             status != kStatusOK)
             return status;
-        const std::uint64_t there = index_.countFitting(0, index_.count(), audio.byteCount);
+        const std::uint64_t there = index_.countFitting(0, index_.count(), audio.byteCount());
         if (there < count)
             facts_.promisedFrames = std::min(valid, count * format_.framesPerPacket);
         index_.cut(there);

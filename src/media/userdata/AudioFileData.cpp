@@ -16,8 +16,12 @@ std::int32_t AudioFile::Implementation::describe()
     if (status != kStatusOK || description)
         return status;
     AudioDescription found;
-    const auto read = [this](const Chunk& chunk, void* to, std::size_t count) { return readBody(chunk, to, count); };
-    status = describeAudio(read, layout, found);
+    if (isWritable) { // what the scan read may have been written over
+        HeaderWindow now(bytes, layout.fileLength);
+        status = describeAudio(now, layout, found);
+    } else {
+        status = describeAudio(*window, layout, found);
+    }
     if (status == kStatusOK)
         description = found;
     return status;
@@ -29,8 +33,8 @@ std::int32_t AudioFile::Implementation::extendAudio(std::uint64_t byteCount, std
     Chunk& data = layout.chunks.back();
     std::int32_t status = writeLastChunkSize(bytes, layout, chunkSize);
     data.padMissing = false;
-    const std::uint64_t packets = byteCount / description->format.bytesPerPacket;
-    if (status == kStatusOK && layout.kind == ContainerKind::iff) {
+    const std::uint64_t packets = byteCount / description->stream().bytesPerPacket;
+    if (status == kStatusOK && layout.kind() == ContainerKind::iff) {
         const Chunk* common = layout.find(fourCC("COMM"));
         std::array<std::byte, 4> frames;
         storeBE(frames.data(), static_cast<std::uint32_t>(packets));
@@ -42,8 +46,8 @@ std::int32_t AudioFile::Implementation::extendAudio(std::uint64_t byteCount, std
     if (status != kStatusOK)
         return status;
     layout.end = layout.nextOf(data);
-    description->byteCount = byteCount;
-    description->packetCount = packets;
+    description->dataSize = byteCount;
+    description->packetCount = description->frames = description->format->countedPackets = packets;
     return bytes.length(layout.fileLength);
 }
 
@@ -53,11 +57,11 @@ std::int32_t AudioFile::Implementation::writeAudio(std::uint64_t firstByte, Byte
         return status;
     if (!isWritable)
         return kStatusWritePermission;
-    if (!description->format.isLinearPCM() || firstByte > description->byteCount)
+    if (!description->stream().isLinearPCM() || firstByte > description->byteCount())
         return kStatusParameterError;
     const std::uint64_t end = firstByte + samples.size();
     const std::uint64_t position = description->dataOffset + firstByte;
-    if (end <= description->byteCount)
+    if (end <= description->byteCount())
         return bytes.write(position, samples.data(), samples.size());
 
     const Chunk last = layout.chunks.back();
@@ -87,14 +91,14 @@ std::int32_t AudioFile::Implementation::writeAudio(std::uint64_t firstByte, Byte
 std::int32_t AudioFile::dataFormat(StreamDescription& format)
 {
     const std::int32_t status = implementation_->describe();
-    format = status == kStatusOK ? implementation_->description->format : StreamDescription{};
+    format = status == kStatusOK ? implementation_->description->stream() : StreamDescription{};
     return status;
 }
 
 std::int32_t AudioFile::audioDataByteCount(std::uint64_t& bytes)
 {
     const std::int32_t status = implementation_->describe();
-    bytes = status == kStatusOK ? implementation_->description->byteCount : 0;
+    bytes = status == kStatusOK ? implementation_->description->byteCount() : 0;
     return status;
 }
 
@@ -118,7 +122,7 @@ std::int32_t AudioFile::readPackets(std::uint64_t firstPacket, std::uint32_t& pa
     if (const std::int32_t status = implementation_->describe(); status != kStatusOK)
         return status;
     const AudioDescription& audio = *implementation_->description;
-    const std::uint64_t packetSize = audio.format.bytesPerPacket;
+    const std::uint64_t packetSize = audio.stream().bytesPerPacket;
     if (packetSize == 0 || (data == nullptr && wanted > 0))
         return kStatusParameterError;
     if (firstPacket >= audio.packetCount)
@@ -139,9 +143,9 @@ std::int32_t AudioFile::readBytes(std::uint64_t firstByte, std::uint32_t& bytes,
     const AudioDescription& audio = *implementation_->description;
     if (data == nullptr && wanted > 0)
         return kStatusParameterError;
-    if (firstByte >= audio.byteCount)
+    if (firstByte >= audio.byteCount())
         return wanted == 0 ? kStatusOK : kStatusEndOfFile;
-    const auto count = static_cast<std::uint32_t>(std::min<std::uint64_t>(wanted, audio.byteCount - firstByte));
+    const auto count = static_cast<std::uint32_t>(std::min<std::uint64_t>(wanted, audio.byteCount() - firstByte));
     const std::int32_t status = implementation_->bytes.read(audio.dataOffset + firstByte, data, count);
     if (status == kStatusOK)
         bytes = count;
@@ -154,7 +158,7 @@ std::int32_t AudioFile::writePackets(std::uint64_t firstPacket, std::uint32_t& p
     if (const std::int32_t status = implementation_->describe(); status != kStatusOK)
         return status;
     const AudioDescription& audio = *implementation_->description;
-    const std::uint64_t packetSize = audio.format.bytesPerPacket;
+    const std::uint64_t packetSize = audio.stream().bytesPerPacket;
     if (firstPacket > audio.packetCount || packetSize == 0 || (data == nullptr && wanted > 0))
         return kStatusParameterError;
     const std::int32_t status = implementation_->writeAudio(

@@ -44,7 +44,7 @@ Dictionary parseInformation(BytesView body)
 std::int32_t AudioFile::information(Dictionary& information)
 {
     information.clear();
-    if (implementation_->layout.kind != ContainerKind::caf)
+    if (implementation_->layout.kind() != ContainerKind::caf)
         return kStatusParameterError;
     if (const std::int32_t status = implementation_->refresh(); status != kStatusOK)
         return status;
@@ -62,7 +62,7 @@ std::int32_t AudioFile::information(Dictionary& information)
 
 std::int32_t AudioFile::setInformation(const Dictionary& information)
 {
-    if (implementation_->layout.kind != ContainerKind::caf)
+    if (implementation_->layout.kind() != ContainerKind::caf)
         return kStatusParameterError;
     ByteWriter writer;
     writer.write(static_cast<std::uint32_t>(information.size()));

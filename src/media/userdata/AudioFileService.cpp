@@ -1,6 +1,7 @@
 #include "media/userdata/AudioFileService.h"
 
 #include "media/containers/ContainerTraits.h"
+#include "media/containers/NewAudioFile.h"
 #include "media/userdata/AudioFileImplementation.h"
 #include "media/userdata/UserDataEditor.h"
 #include "platform/SystemCalls.h"
@@ -46,7 +47,7 @@ std::unique_ptr<AudioFile> AudioFile::open(const URL& url, Permission permission
     std::int32_t ignored;
     std::int32_t& result = status != nullptr ? *status : ignored;
     auto file = openAny(url, permission, result);
-    if (file && !file->implementation_->layout.isEditable()) {
+    if (file && !file->implementation_->layout.container.traits->isEditable) {
         result = kStatusParameterError;
         return nullptr;
     }
@@ -120,7 +121,7 @@ std::unique_ptr<AudioFile> AudioFile::create(const URL& url, FourCC fileType, co
 
 FourCC AudioFile::fileType() const
 {
-    return implementation_->layout.fileType;
+    return implementation_->layout.fileType();
 }
 
 std::int32_t AudioFile::Implementation::scan()
@@ -189,7 +190,7 @@ std::int32_t AudioFile::Implementation::findItem(FourCC type, std::uint32_t inde
 
 std::int32_t AudioFile::Implementation::checkEdit(FourCC type) const
 {
-    if (type == 0 || roleOfChunk(layout.kind, type) != ChunkRole::userData)
+    if (type == 0 || roleOfChunk(layout.kind(), type) != ChunkRole::userData)
         return kStatusParameterError;
     return isWritable ? kStatusOK : kStatusWritePermission;
 }

@@ -385,7 +385,7 @@ std::int32_t UserDataEditor::grow(std::uint64_t extent)
 {
     if (layout_.isBroken || extent > layout_.largestChunk())
         return layout_.isBroken ? kStatusIOError : kStatusFileTooBig;
-    if (layout_.chunks.empty() && layout_.kind == ContainerKind::caf)
+    if (layout_.chunks.empty() && layout_.kind() == ContainerKind::caf)
         return kStatusIOError; // the description must be the first chunk
     if (const std::int32_t status = checkContainerEnd(layout_, layout_.end + 1 + extent); status != kStatusOK)
         return status;

@@ -96,6 +96,8 @@ std::string textOf(const ContainerProblem& problem)
         return "is empty";
     case Kind::noContainer:
         return "no container known here (RIFF, RF64, BW64, AIFF, AIFC, REX2, CAF)";
+    case Kind::onlyRead:
+        return "containers of its kind are only read (RIFX, Wave64)";
     case Kind::chunks:
         return "its chunks cannot be read";
     case Kind::reading:

@@ -12,7 +12,7 @@ ChunkBody requireChunk(CAudioFileIO& file, FourCC id)
     const ChunkSurvey survey = surveyChunks(file, id);
     if (!survey.found)
         throw Failure("has no chunk \"" + fourCCText(id) + "\"");
-    const std::int64_t offset = ChunkBodyOffset(*survey.found, survey.extent);
+    const std::int64_t offset = survey.found->body;
     const std::int64_t size = survey.found->size;
     const std::int64_t there = std::max<std::int64_t>(survey.extent.fileLength - offset, 0);
     if (size < 0 || size > there)

@@ -68,3 +68,10 @@ void openContainer(CAudioFileIO& file, const std::string& path, unsigned int mod
 {
     requireNone(OpenContainer(file, referenceTo(path), mode));
 }
+
+void openChunks(CAudioFileIO& file, const std::string& path)
+{
+    requireOK(file.OpenForChunks(referenceTo(path), 0));
+    if (!file.HasChunks())
+        openContainer(file, path, 0); // which says why
+}

@@ -20,5 +20,7 @@ void openAudio(CAudioFileIO& file, const std::string& path);
 /// Makes ready to read what `file` holds; the Failure that it throws says what to install where that would help.
 void requireDecoder(CAudioFileIO& file);
 
-/// Opens `path` and makes sure that it holds a container; throws Failure.
+/// Opens `path` and makes sure that it holds a container that takes chunks; throws Failure.
 void openContainer(CAudioFileIO& file, const std::string& path, unsigned int mode);
+/// Opens `path` for reading and makes sure that it has chunks, also in a container that is only read; throws Failure.
+void openChunks(CAudioFileIO& file, const std::string& path);

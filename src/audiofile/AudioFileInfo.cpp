@@ -71,13 +71,13 @@ std::optional<tagging::LoopTiming> readLoopTiming(FileWindow& file, ContainerKin
     const auto size = static_cast<std::uint64_t>(chunk.size);
     if (kind == ContainerKind::iff && chunk.id == tagging::kBasicTagging) {
         std::array<std::byte, sizeof(tagging::BasicTaggingChunk)> bytes;
-        const bool there = size >= bytes.size() && file.read(bytes.data(), chunk.body, bytes.size()) == kStatusOK;
+        const bool there = size >= bytes.size() && file.get(bytes, chunk.body);
         return there ? tagging::LoopTimingInAIFF(bytes) : std::nullopt;
     }
     constexpr std::uint64_t most = 1 << 20; // bytes of text that are looked at
     tagging::UUIDBytes uuid;
-    if (kind != ContainerKind::caf || chunk.id != kUuid || size < sizeof uuid ||
-        file.read(uuid, chunk.body, sizeof uuid) != kStatusOK || cafChunkUUIDToChunkID(&uuid) != tagging::kBasicTagging)
+    if (kind != ContainerKind::caf || chunk.id != kUuid || size < sizeof uuid || !file.get(uuid, chunk.body) ||
+        cafChunkUUIDToChunkID(&uuid) != tagging::kBasicTagging)
         return std::nullopt;
     const std::uint64_t start = chunk.body + sizeof uuid;
     Bytes payload(static_cast<std::size_t>(std::min({size - sizeof uuid, file.length() - start, most})));

@@ -26,6 +26,7 @@ struct ChunkEntry {
     FourCC id = 0;
     std::int64_t offset = 0; // of the header
     std::int64_t size = 0;   // effective size of the body; may run past the end of a damaged file, or be negative
+    std::int64_t body = 0;   // where that begins
 };
 
 /// Where a container begins and ends.

@@ -108,10 +108,11 @@ std::int32_t CAudioFileIO::ForEachChunk(const std::function<bool(const ChunkEntr
     while (visit && walk.next()) {
         const platform::WalkedChunk& chunk = walk.chunk();
         const bool isOpen = traits.kind == ContainerKind::caf && chunk.size == -1 && chunk.id == traits.soundId;
-        const std::int64_t size = isOpen ? window.fileLength() - static_cast<std::int64_t>(chunk.body) : chunk.size;
+        const auto body = static_cast<std::int64_t>(chunk.body);
+        const std::int64_t size = isOpen ? window.fileLength() - body : chunk.size;
         // Zeros are what some writers leave behind the last chunk; a walk gets no further there.
         const bool isNone = chunk.id == 0 && size == 0;
-        if (isNone || !visit({chunk.id, static_cast<std::int64_t>(chunk.position), size}))
+        if (isNone || !visit({chunk.id, static_cast<std::int64_t>(chunk.position), size, body}))
             return kStatusOK;
     }
     return walk.status();
@@ -161,7 +162,7 @@ std::int32_t CAudioFileIO::LocateChunk(FourCC id, ChunkEntry& chunk)
 {
     FoundChunk found;
     const std::int32_t result = Locate(id, found);
-    chunk = {result == kFound ? id : 0, found.position, found.size};
+    chunk = {result == kFound ? id : 0, found.position, found.size, found.body};
     return result;
 }
 

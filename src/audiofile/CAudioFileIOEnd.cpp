@@ -8,11 +8,6 @@ namespace {
 constexpr std::int64_t kCAFOpenEnd = -1;
 constexpr FourCC kSoundData = fourCC("SSND");
 
-std::int64_t headerSizeIn(bool isCAF)
-{
-    return static_cast<std::int64_t>(isCAF ? sizeof(CAFChunkHeader) : sizeof(ChkHeader));
-}
-
 bool looksLikeAnId(FourCC id)
 {
     return id != 0 && fourCCText(id).size() == sizeof id;
@@ -35,8 +30,8 @@ ContainerTail::Fault faultOf(const ContainerTail& tail)
     const bool isCAF = tail.extent.id == kCaff;
     if (last.size < 0)
         return Fault::cutShort;
-    const std::int64_t headerSize = headerSizeIn(isCAF);
-    const bool isCutShort = last.size > tail.extent.fileLength - last.offset - headerSize;
+    const std::int64_t headerSize = last.body - last.offset;
+    const bool isCutShort = last.size > tail.extent.fileLength - last.body;
     if ((isCutShort || tail.stray > 0) && !isCAF && !looksLikeAnId(last.id))
         return Fault::noId;
     if (isCutShort) // AddChunk puts that right, except in CAF
@@ -59,8 +54,7 @@ std::int32_t ExamineContainerTail(CAudioFileIO& file, ContainerTail& tail)
         return status;
     const bool isCAF = tail.extent.id == kCaff;
     const std::int64_t size = tail.last.size;
-    const std::int64_t body = tail.last.offset + headerSizeIn(isCAF);
-    if (tail.last.offset != 0 && __builtin_add_overflow(body + (isCAF ? 0 : size & 1), size, &tail.end))
+    if (tail.last.offset != 0 && __builtin_add_overflow(tail.last.body + (isCAF ? 0 : size & 1), size, &tail.end))
         tail.end = std::numeric_limits<std::int64_t>::max();
     tail.stray = tail.extent.fileLength - tail.end;
     tail.fault = faultOf(tail);

@@ -54,6 +54,29 @@ class List(CommandTest):
             self.failure("chunks", "add", name, "note", stdin=b"x")
         self.assert_no_litter("text.wav", "empty.wav", "short.wav")
 
+    def test_containers_that_are_only_read(self):
+        def wave64(*chunks):
+            name = bytes.fromhex("f3acd3118cd100c04f8edb8a")
+            body = b"".join(i + name + struct.pack("<Q", 24 + len(b)) + b + bytes(-len(b) % 8) for i, b in chunks)
+            start = b"riff" + bytes.fromhex("2e91cf11a5d628db04c10000") + struct.pack("<Q", 40 + len(body)) + b"wave"
+            return start + name + body
+
+        form = struct.pack("<HHIIHH", 1, 1, 8000, 16000, 2, 16)
+        self.write("a.w64", wave64((b"fmt ", form), (b"note", b"abc"), (b"data", bytes(20))))
+        swapped = struct.pack(">HHIIHH", 1, 1, 8000, 16000, 2, 16)
+        chunks = chunk(b"fmt ", swapped, ">") + chunk(b"note", b"abc", ">") + chunk(b"data", bytes(20), ">")
+        self.write("a.wav", b"RIFX" + struct.pack(">I", 4 + len(chunks)) + b"WAVE" + chunks)
+        for name, container, listing in (
+                ("a.w64", "W64f", ["fmt \t40\t16", "note\t80\t3", "data\t112\t20"]),
+                ("a.wav", "RIFX", ["fmt \t12\t16", "note\t36\t3", "data\t48\t20"])):
+            with self.subTest(name):
+                self.assertEqual(self.lines("chunks", name), listing)
+                self.assertEqual(self.json("chunks", name)["container"], container)
+                self.assertEqual(self.run_command("chunks", "get", name, "note").stdout, b"abc")
+                for arguments in (["add", name, "note", "--from", name], ["remove", name, "note"]):
+                    self.assertIn("only read", self.failure("chunks", *arguments))
+        self.assert_no_litter("a.w64", "a.wav")
+
     def test_list_is_not_held_in_memory(self):
         self.write("many.wav", wave(chunk(b"note", b"") * 400_000))
         listing = 'ulimit -v $((96 * 1024)); exec "$0" chunks many.wav --json'

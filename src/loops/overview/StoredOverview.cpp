@@ -20,7 +20,6 @@ constexpr std::int32_t kNotFound = 0;
 constexpr std::int32_t kOutOfMemory = -108;
 
 constexpr std::int64_t kOlderPrefixSize = 20;
-constexpr std::int64_t kChunkHeaderSize = sizeof(ChkHeader);
 
 struct Body {
     std::int64_t offset = 0;
@@ -30,11 +29,9 @@ struct Body {
 /// 1 found, 0 not found, or an error; one for a body that is not all in the file, too.
 std::int32_t findBody(CAudioFileIO& file, FourCC id, Body& body)
 {
-    const std::int64_t headerSize =
-        file.Info().fileType == kCaff ? std::int64_t{sizeof(CAFChunkHeader)} : kChunkHeaderSize;
     ChunkEntry chunk;
     const std::int32_t result = file.LocateChunk(id, chunk);
-    body = {chunk.offset + headerSize, chunk.size};
+    body = {chunk.body, chunk.size};
     if (result == kFound && (chunk.size < 0 || chunk.size > file.GetEOF() - body.offset))
         return kStatusEndOfFile;
     return result;

@@ -48,7 +48,7 @@ void AudioDescriber::meet(const WalkedChunk& chunk)
         locateSound(chunk);
     else if (chunk.id == fourCC("fact") && isLikeWAVE() && !factFrames_ && !isComplete()) {
         std::array<std::byte, 4> frames;
-        if (window_.read(frames.data(), chunk.body, frames.size()) == kStatusOK)
+        if (window_.get(frames, chunk.body))
             factFrames_ = load<std::uint32_t>(frames.data(), traits.order);
     } else if (traits.kind == ContainerKind::caf && chunk.id == fourCC("pakt") && !packetTable_)
         readPacketTable(chunk);
@@ -96,7 +96,7 @@ void AudioDescriber::locateSound(const WalkedChunk& chunk)
 void AudioDescriber::readPacketTable(const WalkedChunk& chunk)
 {
     std::array<std::byte, 24> bytes;
-    if (window_.read(bytes.data(), chunk.body, bytes.size()) != kStatusOK)
+    if (!window_.get(bytes, chunk.body))
         return;
     ByteReader reader(bytes);
     packetTable_.emplace();

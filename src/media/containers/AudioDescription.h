@@ -56,7 +56,7 @@ private:
     HeaderWindow& window_;
     const Container& container_;
     AudioDescription found_;
-    bool metFormat_ = false; // a chunk of that id, if only the start of one
+    bool metFormat_ = false;     // a chunk of that id, if only the start of one
     std::uint32_t speakers_ = 0; // of CAF
     std::optional<std::uint32_t> factFrames_;
     std::optional<PacketTable> packetTable_;

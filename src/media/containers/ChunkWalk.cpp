@@ -33,9 +33,10 @@ std::int64_t atMost63Bits(std::uint64_t size)
 std::int32_t readContainerHeader(HeaderWindow& window, ContainerChkExtended& header)
 {
     header = {};
-    if (const std::int32_t status = window.read(&header, 0, ContainerChkExtended::kHeadersSize); status != kStatusOK)
-        return status;
-    const auto* const bytes = reinterpret_cast<const unsigned char*>(&header);
+    const std::byte* bytes = window.at(0, ContainerChkExtended::kHeadersSize);
+    if (bytes == nullptr)
+        return window.reason();
+    std::memcpy(static_cast<void*>(&header), bytes, ContainerChkExtended::kHeadersSize);
     const auto id = loadBE<FourCC>(bytes);
     const FourCC sizesChunk = id == kRF64 || id == kBW64 ? kDs64 : kJUNK;
     if (loadBE<FourCC>(bytes + 8) == kWAVE && loadBE<FourCC>(bytes + 12) == sizesChunk) {
@@ -54,8 +55,8 @@ std::int64_t nextChunkHeader(HeaderWindow& window, const ContainerChkExtended& h
 {
     const auto length = static_cast<std::int64_t>(window.length());
     const auto read = [&](std::int64_t at) {
-        return at < 0 ? std::int32_t{kStatusEndOfFile}
-                      : window.read(&next, static_cast<std::uint64_t>(at), sizeof next);
+        const bool isThere = at >= 0 && window.get(next, static_cast<std::uint64_t>(at));
+        return isThere ? std::int32_t{kStatusOK} : at < 0 ? std::int32_t{kStatusEndOfFile} : window.reason();
     };
     std::int64_t size = 0;
     std::int64_t candidate = sizeof(ContainerChk);

@@ -53,13 +53,11 @@ public:
             return 0;
         const auto there = static_cast<std::size_t>(std::min<std::uint64_t>(count, length_ - position));
         std::size_t done = 0;
-        while (done < there) {
-            const std::size_t step = std::min(there - done, kMostAtOnce);
-            const std::byte* bytes = at(position + done, step);
+        for (std::size_t step = 0; done < there; done += step) {
+            const std::byte* bytes = at(position + done, step = std::min(there - done, kMostAtOnce));
             if (bytes == nullptr)
                 break;
-            std::memcpy(static_cast<std::byte*>(to) + done, bytes, step);
-            done += step;
+            std::copy_n(bytes, step, static_cast<std::byte*>(to) + done);
         }
         return done;
     }
@@ -68,6 +66,15 @@ public:
     std::int32_t read(void* to, std::uint64_t position, std::size_t count)
     {
         return readSome(to, position, count) == count ? std::int32_t{kStatusOK} : reason_;
+    }
+    /// A record, which is not touched when it cannot be had; reason() then says why.
+    template <class Record>
+    bool get(Record& record, std::uint64_t position)
+    {
+        const std::byte* bytes = at(position, sizeof record);
+        if (bytes != nullptr)
+            std::memcpy(&record, bytes, sizeof record);
+        return bytes != nullptr;
     }
 
 private:

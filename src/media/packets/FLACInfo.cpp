@@ -155,8 +155,8 @@ std::int32_t readFLACInfo(HeaderWindow& file, FLACInfo& info)
     info = {};
     info.format.formatId = fourCC("flac");
     std::array<std::byte, 16> bytes;
-    if (const std::int32_t status = file.read(bytes.data(), offset, bytes.size()); status != kStatusOK)
-        return status;
+    if (!file.get(bytes, offset))
+        return file.reason();
     const std::uint32_t mostInBlock = loadBE<std::uint16_t>(bytes.data());
     const std::uint32_t largestFrame = loadBE<std::uint32_t>(bytes.data() + 4) & 0xFFFFFF;
     // Bits: 20 rate, 3 channels - 1, 5 of a sample - 1, 36 frames.

@@ -43,7 +43,7 @@ std::string walkOf(const Memory& file, WalkPolicy policy)
     std::int64_t end = 0;
     while (walk.next()) {
         const WalkedChunk& chunk = walk.chunk();
-        text += fourCCText(chunk.id) + ":" + (chunk.size == INT64_MAX ? "open" : std::to_string(chunk.size)) + " ";
+        text += (chunk.id != 0 ? fourCCText(chunk.id) : "zeros") + ":" + (chunk.size == INT64_MAX ? "open" : std::to_string(chunk.size)) + " ";
         end = walk.following();
     }
     if (policy == WalkPolicy::toTheSound)
@@ -87,7 +87,7 @@ TEST(ChunkWalkPolicies, DifferWhereTheySayAndNowhereElse)
          "fmt :16 note:3 data:4 at " + std::to_string(end), "fmt :16 note:3 data:4 at " + std::to_string(end + 3)},
         {"zeros", with(with(wave, end, "\0\0\0\0\0\0\0\0"sv), 4, "\x40\0\0\0"sv),
          "fmt :16 note:3 data:4 broken at " + std::to_string(end),
-         "fmt :16 note:3 data:4 :0 at " + std::to_string(end + 8)},
+         "fmt :16 note:3 data:4 zeros:0 at " + std::to_string(end + 8)},
         {"too short for a chunk", Bytes(wave.begin(), wave.begin() + 14), "at 12", "begin -50"},
     };
     for (const auto& each : cases) {

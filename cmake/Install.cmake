@@ -19,7 +19,8 @@ foreach(room platform/core platform files loops/tagging audiofile files/registry
 endforeach()
 # Of what knows sound, the services and the types that they speak in; the test house.arrows reads this list too.
 set(media_headers
-    media/samples/SampleConversion.h media/samples/SampleExtremes.h media/samples/StreamDescription.h
+    media/samples/SampleConversion.h media/samples/SampleExtremes.h media/samples/SoundFacts.h
+    media/samples/StreamDescription.h
     media/containers/AudioHandle.h media/containers/ContainerHeaders.h media/containers/ContainerTraits.h
     media/containers/StoredFormat.h
     media/packets/PacketTable.h

@@ -6,6 +6,7 @@
 #include "audiofile/CChunkData.h"
 #include "files/CFileIO.h"
 #include "media/containers/ContainerHeaders.h"
+#include "media/containers/ContainerTraits.h"
 #include "media/userdata/AudioFileService.h"
 #include "platform/ContentType.h"
 #include "platform/core/Error.h"

@@ -30,11 +30,9 @@ constexpr FourCC kOfTags[] = {tagging::kBasicTagging,  tagging::kCategories,
                               fourCC("AUTH"),          fourCC("(c) "),
                               fourCC("COMT")};
 
-bool isOfTheSound(FourCC id)
+bool isOfTheSound(platform::ContainerKind container, FourCC id)
 {
-    using Kind = platform::ContainerKind;
-    const auto isPart = [id](Kind kind) { return platform::roleOfChunk(kind, id) != platform::ChunkRole::userData; };
-    return isPart(Kind::riff) || isPart(Kind::iff) || isPart(Kind::caf) ||
+    return platform::roleOfChunk(container, id) != platform::ChunkRole::userData ||
            std::ranges::find(kOfNoUse, id) != std::end(kOfNoUse);
 }
 
@@ -80,14 +78,16 @@ std::vector<std::string> otherChunks(const std::string& path, bool holdsTags)
     CAudioFileIO file;
     if (file.Open(referenceTo(path), 0) != kStatusOK)
         return others;
-    file.ForEachChunk([&](const ChunkEntry& chunk) {
-        const bool isTold = isOfTheSound(chunk.id) ||
+    ContainerExtent extent;
+    const auto visit = [&](const ChunkEntry& chunk) {
+        const bool isTold = isOfTheSound(extent.kind, chunk.id) ||
                             (holdsTags && std::ranges::find(kOfTags, chunk.id) != std::end(kOfTags)) ||
                             std::ranges::find(others, nameOf(chunk.id)) != others.end();
         if (!isTold)
             others.push_back(nameOf(chunk.id));
         return others.size() < 1000;
-    });
+    };
+    file.ForEachChunk(visit, &extent);
     return others;
 }
 

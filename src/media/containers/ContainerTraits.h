@@ -66,8 +66,7 @@ inline constexpr std::size_t kMostOfContainerStart = 40;
 /// The container that a file is by its first bytes, at most kMostOfContainerStart of them; null for none of these.
 KT_EXPORT const ContainerTraits* recogniseContainer(BytesView start);
 
-/// What a chunk is to its container: the one list by which every guard of an edit goes. Of the containers that are
-/// edited; in others all is user data.
+/// What a chunk is to its container: the one list by which every guard of an edit goes.
 KT_EXPORT ChunkRole roleOfChunk(ContainerKind kind, FourCC id);
 
 } // namespace platform

@@ -6,7 +6,9 @@
 
 #include <algorithm>
 #include <array>
+#include <new>
 #include <utility>
+#include <vector>
 
 extern "C" {
 #include <libavcodec/avcodec.h>
@@ -52,6 +54,15 @@ bool isOneRun(const Demuxer& demuxer)
 std::uint64_t framesPerBlockOf(const AVCodecParameters& parameters)
 {
     return parameters.block_align > 0 ? framesOfBlocks(parameters, parameters.block_align) : 0;
+}
+
+/// Every packet decodes to a frame, without delay, and all of these are of one length, but where the stream changes.
+bool hasConstantPackets(AVCodecID coding)
+{
+    constexpr std::array constant{AV_CODEC_ID_MP1,    AV_CODEC_ID_MP2,   AV_CODEC_ID_MP3,      AV_CODEC_ID_AC3,
+                                  AV_CODEC_ID_EAC3,   AV_CODEC_ID_AAC,   AV_CODEC_ID_AAC_LATM, AV_CODEC_ID_DTS,
+                                  AV_CODEC_ID_AMR_NB, AV_CODEC_ID_AMR_WB};
+    return std::ranges::find(constant, coding) != constant.end();
 }
 
 /// Every packet decodes by itself.
@@ -101,7 +112,7 @@ std::int32_t FileDecoder::begin()
     std::int32_t status = kStatusOK;
     codec_ = Codec::open(*demuxer_.stream().codecpar, unit.num, unit.den,
                          endsWithTime_ ? Codec::Padding::kept : Codec::Padding::dropped, status);
-    expected_ = 0;
+    expected_ = sent_ = 0;
     isNumbered_ = true;
     hasGivenUp_ = false;
     pending_.reset();
@@ -120,6 +131,7 @@ std::int32_t FileDecoder::restart()
 std::int32_t FileDecoder::describeAsDecoded()
 {
     base_ = AV_NOPTS_VALUE;
+    isCounting_ = numbers_ == Numbers::byCount;
     Span span;
     std::int32_t status = next(span);
     if (status != kStatusOK)
@@ -136,28 +148,30 @@ std::int32_t FileDecoder::describeAsDecoded()
     const AVCodecParameters& parameters = *demuxer_.stream().codecpar;
     const StreamDescription file =
         fileFormatOf(parameters, codec_->sourceBits(), frames->sampleRate, frames->channelsPerFrame);
-    if (numbers_ == Numbers::byTime && decoded().sample_rate != parameters.sample_rate)
+    const bool isAnew = numbers_ == Numbers::byTime && decoded().sample_rate != parameters.sample_rate;
+    if (isAnew)
         numbers_ = Numbers::byCount;
     const bool isLayerII = parameters.codec_id == AV_CODEC_ID_MP2 && std::string_view(demuxer_.name()) == "mp3";
     const FourCC fileType =
         isLayerII ? fourCC("MPG2") : fileTypeOf(demuxer_.name(), demuxer_.brand(), parameters.codec_id);
+    const auto stated = SoundDigest::statedBy(parameters);
     std::uint64_t count = 0;
-    if (status = countFrames(count); status != kStatusOK)
+    if (status = countFrames(isAnew ? 0 : span.end, count); status != kStatusOK)
         return status;
     limit_ = count;
     facts.promisedFrames = promisedFrames(count, frames->sampleRate);
     note(facts);
-    if (status = restart(); status != kStatusOK)
-        return status;
     describe(fileType, file, *frames, 0, count, DecodedFileHandle::unknownCount);
-    if (const auto stated = SoundDigest::statedBy(*demuxer_.stream().codecpar)) // of the file opened again
+    if (stated)
         noteChecksum(*stated, file.bitsPerChannel);
-    forget();
+    forget(); // whoever reads starts anew; whoever only asks does not pay for it
     return kStatusOK;
 }
 
-/// Where numbers are exact anywhere, those of the last frames tell; else everything is decoded once.
-std::int32_t FileDecoder::countFrames(std::uint64_t& count)
+/// Where numbers are exact anywhere, those of the last frames tell, and where every packet has as many frames as the
+/// first, their number; else everything is decoded once. `first` are the frames decoded so far, 0 where these do not
+/// count.
+std::int32_t FileDecoder::countFrames(std::uint64_t first, std::uint64_t& count)
 {
     constexpr std::uint64_t tail = 1u << 16;
     const AVStream& stream = demuxer_.stream();
@@ -165,8 +179,18 @@ std::int32_t FileDecoder::countFrames(std::uint64_t& count)
     const auto length = static_cast<std::uint64_t>(std::max<std::int64_t>(stated, 0));
     count = 0;
     std::int32_t status = kStatusOK;
-    if (canLand() && length > 2 * tail && length < std::uint64_t{1} << 48 && land(length, tail))
+    const bool isLong = canLand() && length > 2 * tail && length < std::uint64_t{1} << 48;
+    const bool isCounted =
+        numbers_ == Numbers::byCount && first > 0 && sent_ == 1 && hasConstantPackets(stream.codecpar->codec_id);
+    if (isCounted) {
+        status = countPackets(first, count);
+    } else if (isLong) {
+        if (land(length, tail, 0))
+            status = decodeRest(count);
+    } else if (first > 0) {
+        count = first;
         status = decodeRest(count);
+    }
     if (status == kStatusOK && count == 0)
         status = countFromStart(count);
     if (status == kStatusOK && numbers_ == Numbers::byTime && count / kFramesPerByte > demuxer_.size()) {
@@ -178,6 +202,7 @@ std::int32_t FileDecoder::countFrames(std::uint64_t& count)
     // Where the file states it, the sound ends within the last block, or ahead of padding to 8 bytes (Wave64).
     if (numbers_ == Numbers::byPosition && length < count && count - length < framesPerBlock_ + 8)
         count = length;
+    isCounting_ = false;
     return status;
 }
 
@@ -200,9 +225,60 @@ std::uint64_t FileDecoder::promisedFrames(std::uint64_t count, double sampleRate
     return promised > count + tolerance ? promised : 0;
 }
 
+/// From the second packet on, which is the next; 0 where something says that packets differ. The last ones are decoded:
+/// one that is cut gives no frames.
+std::int32_t FileDecoder::countPackets(std::uint64_t framesPerPacket, std::uint64_t& count)
+{
+    constexpr std::size_t kLast = 4;
+    std::vector<Packet> last;
+    count = 0;
+    std::uint64_t packets = 1;
+    for (std::int32_t status = kStatusOK;; ++packets) {
+        Packet packet = makePacket();
+        if (!demuxer_.read(*packet, status)) {
+            if (status != kStatusOK)
+                return status;
+            break;
+        }
+        if (av_packet_get_side_data(packet.get(), AV_PKT_DATA_SKIP_SAMPLES, nullptr) != nullptr)
+            return kStatusOK;
+        if (packet->pts != AV_NOPTS_VALUE)
+            checkpoints_.offer({packet->pts, packet->pos, packets * framesPerPacket});
+        packet->pts = packet->dts = static_cast<std::int64_t>(packets);
+        if (last.size() == kLast)
+            last.erase(last.begin());
+        last.push_back(std::move(packet));
+    }
+    count = packets * framesPerPacket;
+    if (!endOfLastPackets(last, framesPerPacket, count))
+        count = 0;
+    return kStatusOK;
+}
+
+/// The number behind the last frame that the last packets decode to; false where they have other numbers of frames.
+bool FileDecoder::endOfLastPackets(std::span<const Packet> last, std::uint64_t framesPerPacket, std::uint64_t& count)
+{
+    if (last.empty())
+        return true;
+    count = 0;
+    codec_->flush();
+    for (const Packet& packet : last) {
+        if (codec_->send(packet.get()) == Codec::Sent::outOfMemory)
+            throw std::bad_alloc();
+        for (Codec::Result result = codec_->receive(); result == Codec::Result::frame; result = codec_->receive()) {
+            const AVFrame& frame = decoded();
+            if (static_cast<std::uint64_t>(frame.nb_samples) != framesPerPacket || frame.pts < packet->pts)
+                return false;
+            count = (static_cast<std::uint64_t>(frame.pts) + 1) * framesPerPacket;
+        }
+    }
+    return count > 0;
+}
+
 std::int32_t FileDecoder::countFromStart(std::uint64_t& count)
 {
     count = 0;
+    checkpoints_ = {};
     isCounting_ = numbers_ == Numbers::byCount;
     std::int32_t status = restart();
     if (status == kStatusOK)
@@ -250,7 +326,7 @@ std::int32_t FileDecoder::startAt(std::uint64_t& number)
     const int tries = !isWhole || !canLand() || isChained_ ? 0 : attempts;
     std::uint64_t back = warmUp_;
     for (int i = 0; i < tries && !hasLanded && number > back; ++i, back = 4 * back + kReach)
-        hasLanded = land(number, back);
+        hasLanded = land(number, back, warmUp_);
     if (hasLanded) {
         number = pending_->start;
         return kStatusOK;
@@ -273,8 +349,8 @@ std::int64_t FileDecoder::timeOf(std::uint64_t number) const
                           AV_ROUND_DOWN);
 }
 
-/// Decodes from `back` frames before `number` on; false when frames come too late for what `number` needs.
-bool FileDecoder::land(std::uint64_t number, std::uint64_t back)
+/// Decodes from `back` frames before `number` on; false when frames come later than `needed` ahead of it.
+bool FileDecoder::land(std::uint64_t number, std::uint64_t back, std::uint64_t needed)
 {
     pending_.reset();
     if (!demuxer_.seek(timeOf(number - back)))
@@ -285,7 +361,7 @@ bool FileDecoder::land(std::uint64_t number, std::uint64_t back)
     isNumbered_ = hasGivenUp_ = false;
     page_ = -1;
     Span span;
-    if (decodeNext(span) != kStatusOK || span.start == kNever || span.start > number - warmUp_)
+    if (decodeNext(span) != kStatusOK || span.start == kNever || span.start > number - needed)
         return false;
     pending_ = span;
     return true;
@@ -384,6 +460,7 @@ std::int32_t FileDecoder::sendPacket()
     if (corrections_)
         corrections_->attachTo(*packet_);
     numberPacket();
+    ++sent_;
     const Codec::Sent sent = codec_->send(packet_.get());
     if (sent == Codec::Sent::failed)
         passOver();

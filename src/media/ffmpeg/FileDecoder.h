@@ -9,6 +9,7 @@
 
 #include <memory>
 #include <optional>
+#include <span>
 
 namespace platform::ffmpeg {
 
@@ -28,14 +29,16 @@ private:
     std::int32_t begin();
     std::int32_t describeAsDecoded();
     std::uint64_t promisedFrames(std::uint64_t count, double sampleRate) const;
-    std::int32_t countFrames(std::uint64_t& count);
+    std::int32_t countFrames(std::uint64_t first, std::uint64_t& count);
+    std::int32_t countPackets(std::uint64_t framesPerPacket, std::uint64_t& count);
+    bool endOfLastPackets(std::span<const Packet> last, std::uint64_t framesPerPacket, std::uint64_t& count);
     std::int32_t countFromStart(std::uint64_t& count);
     std::int32_t decodeRest(std::uint64_t& end);
     std::int64_t startOf(const AVFrame& frame) const;
     std::int32_t restart();
     bool canLand() const;
     std::int64_t timeOf(std::uint64_t number) const;
-    bool land(std::uint64_t number, std::uint64_t back);
+    bool land(std::uint64_t number, std::uint64_t back, std::uint64_t needed);
     bool landAtCheckpoint(std::uint64_t number);
     std::int32_t decodeNext(Span& span);
     bool tellsNumber(const AVFrame& frame) const;
@@ -52,6 +55,7 @@ private:
     std::unique_ptr<CorrectionFile> corrections_; // null when there are none
     std::unique_ptr<Codec> codec_;
     Packet packet_;
+    std::uint64_t sent_ = 0; // packets since the start
     Numbers numbers_ = Numbers::byCount;
     std::int64_t base_ = 0;            // the time, or the position, of number 0
     std::uint64_t framesPerBlock_ = 0; // of blocks of one size

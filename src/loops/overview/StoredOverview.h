@@ -13,9 +13,10 @@
 /// is the number that it covers where the caller knows better than the file (compressed formats); 0: what the file
 /// says. `stored` (may be null) becomes true when a chunk was stored: of silence CAF gets none, and loses the one it
 /// had. 0; kStatusParameterError, the file untouched, for a block that is none or does not fit the frames, for a file
-/// that is not AIFF, WAVE or CAF, for a CAF file whose chunk "data" is open-ended or not all there, and where bytes
-/// that are no chunk stand behind the last one (CAudioFileIO::PrepareToAppend); -108 when memory is short; else the
-/// status of the open, or of CAudioFileIO::AddChunk. In CAF the old one goes when the new one stands.
+/// that is not AIFF, WAVE or CAF, for a CAF file whose chunk "data" is open-ended (SettleContainerEnd ends it) or not
+/// all there, and where bytes that are no chunk stand behind the last one (CAudioFileIO::PrepareToAppend); -108 when
+/// memory is short; else the status of the open, or of CAudioFileIO::AddChunk. In CAF the old one goes when the new one
+/// stands.
 KT_EXPORT std::int32_t WriteOverviewToAudioFile(const CFileRef& ref, KTMem* overview, long frames, bool* stored);
 
 /// The overview stored in the file, or none. `frames` as above. `status` (may be null): 0 with an overview, and also

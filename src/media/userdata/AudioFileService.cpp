@@ -1,7 +1,7 @@
 #include "media/userdata/AudioFileService.h"
 
 #include "media/containers/ContainerTraits.h"
-#include "media/containers/NewAudioFile.h"
+#include "media/containers/NewContainer.h"
 #include "media/userdata/AudioFileImplementation.h"
 #include "media/userdata/UserDataEditor.h"
 #include "platform/SystemCalls.h"
@@ -91,7 +91,9 @@ std::unique_ptr<AudioFile> AudioFile::create(const URL& url, FourCC fileType, co
     std::int32_t ignored;
     std::int32_t& result = status != nullptr ? *status : ignored;
     const std::string path = pathOf(url);
-    const Bytes content = newAudioFile(fileType, format);
+    // Samples begin on a page, and filler ahead of them is for user data to come.
+    const Bytes content = headerOf(
+        {.fileType = fileType, .format = format, .isCounted = false, .hasReservation = true, .dataOffset = 4096});
     if (path.empty() || content.empty()) {
         result = kStatusParameterError;
         return nullptr;

@@ -2,11 +2,13 @@
 #include "audiofile/CAudioFileIO.h"
 
 #include "audiofile/ContainerEditor.h"
+#include "audiofile/ContainerTail.h"
 
 namespace {
 
 constexpr std::int32_t kNotWritable = -6;
 constexpr std::int32_t kNotRemoved = -7;
+constexpr std::int64_t kCAFOpenEnd = -1;
 
 } // namespace
 
@@ -49,4 +51,47 @@ std::int32_t CAudioFileIO::RemoveChunk(unsigned int id)
     if (const std::int32_t status = PrepareToEdit(); status != kStatusOK)
         return status;
     return ContainerEditor(*this, mInfo).remove(id);
+}
+
+std::int32_t CAudioFileIO::PrepareToAppend()
+{
+    if (!IsOpenForWriting())
+        return kStatusWritePermission;
+    if (const std::int32_t status = PrepareToEdit(); status != kStatusOK)
+        return status;
+    ContainerTail tail;
+    if (const std::int32_t status = ExamineContainerTail(*this, tail); status != kStatusOK)
+        return status;
+    if (tail.fault != ContainerTail::Fault::none)
+        return kStatusParameterError;
+    std::int32_t status = kStatusOK;
+    if (tail.extent.id == kCaff && tail.last.id == kData)
+        status = SettleOpenEnd(tail.last);
+    if (status != kStatusOK)
+        return status;
+    const bool lacksPad = tail.stray == -1 && (tail.last.size & 1) != 0;
+    if (tail.stray < 0 && !lacksPad) // a last chunk cut short: AddChunk gives it the size that it has
+        return kStatusOK;
+    if (lacksPad) {
+        const char pad = 0;
+        status = Write(&pad, tail.end - 1, sizeof pad);
+    } else if (tail.stray > 0) {
+        status = SetEOF(tail.end);
+    }
+    if (status == kStatusOK)
+        mInfo.fileLength = tail.end;
+    return status;
+}
+
+/// Gives a chunk "data" that goes to the end of the file the size that it has there.
+std::int32_t CAudioFileIO::SettleOpenEnd(const ChunkEntry& data)
+{
+    const std::int64_t position = data.offset + std::int64_t{offsetof(CAFChunkHeader, size)};
+    std::int64_t stored = 0;
+    if (const std::int32_t status = Read(&stored, position, sizeof stored, nullptr); status != kStatusOK)
+        return status;
+    if (inByteOrder(stored, std::endian::big) != kCAFOpenEnd)
+        return kStatusOK;
+    stored = inByteOrder(data.size, std::endian::big);
+    return Write(&stored, position, sizeof stored);
 }

@@ -1,11 +1,9 @@
-// CAudioFileIO: the end of a container, looked at before another chunk goes there.
 #include "audiofile/ContainerTail.h"
 
 #include <limits>
 
 namespace {
 
-constexpr std::int64_t kCAFOpenEnd = -1;
 constexpr FourCC kSoundData = fourCC("SSND");
 
 bool looksLikeAnId(FourCC id)
@@ -59,47 +57,4 @@ std::int32_t ExamineContainerTail(CAudioFileIO& file, ContainerTail& tail)
     tail.stray = tail.extent.fileLength - tail.end;
     tail.fault = faultOf(tail);
     return kStatusOK;
-}
-
-std::int32_t CAudioFileIO::PrepareToAppend()
-{
-    if (!IsOpenForWriting())
-        return kStatusWritePermission;
-    if (const std::int32_t status = PrepareToEdit(); status != kStatusOK)
-        return status;
-    ContainerTail tail;
-    if (const std::int32_t status = ExamineContainerTail(*this, tail); status != kStatusOK)
-        return status;
-    if (tail.fault != ContainerTail::Fault::none)
-        return kStatusParameterError;
-    std::int32_t status = kStatusOK;
-    if (tail.extent.id == kCaff && tail.last.id == kData)
-        status = SettleOpenEnd(tail.last);
-    if (status != kStatusOK)
-        return status;
-    const bool lacksPad = tail.stray == -1 && (tail.last.size & 1) != 0;
-    if (tail.stray < 0 && !lacksPad) // a last chunk cut short: AddChunk gives it the size that it has
-        return kStatusOK;
-    if (lacksPad) {
-        const char pad = 0;
-        status = Write(&pad, tail.end - 1, sizeof pad);
-    } else if (tail.stray > 0) {
-        status = SetEOF(tail.end);
-    }
-    if (status == kStatusOK)
-        mInfo.fileLength = tail.end;
-    return status;
-}
-
-/// Gives a chunk "data" that goes to the end of the file the size that it has there.
-std::int32_t CAudioFileIO::SettleOpenEnd(const ChunkEntry& data)
-{
-    const std::int64_t position = data.offset + std::int64_t{offsetof(CAFChunkHeader, size)};
-    std::int64_t stored = 0;
-    if (const std::int32_t status = Read(&stored, position, sizeof stored, nullptr); status != kStatusOK)
-        return status;
-    if (inByteOrder(stored, std::endian::big) != kCAFOpenEnd)
-        return kStatusOK;
-    stored = inByteOrder(data.size, std::endian::big);
-    return Write(&stored, position, sizeof stored);
 }

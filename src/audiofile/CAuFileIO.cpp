@@ -50,7 +50,7 @@ CAuFileIO::CAuFileIO()
     Init();
 }
 
-CAuFileIO::CAuFileIO(int& status, const CFileRef& ref, unsigned char write) : mFileRef(ref)
+CAuFileIO::CAuFileIO(int& status, const CFileRef& ref, unsigned char write) : fileRef_(ref)
 {
     Init();
     status = Open(write);
@@ -60,32 +60,32 @@ CAuFileIO::~CAuFileIO() = default;
 
 void CAuFileIO::Init()
 {
-    mFile.reset();
-    mFileType = 0;
-    mOpenMode = kClosed;
+    file_.reset();
+    fileType_ = 0;
+    openMode_ = kClosed;
     ResetCounts();
 }
 
 void CAuFileIO::ResetCounts()
 {
-    mDataFormat = {};
-    mAudioByteCount = mPacketCount = 0;
+    dataFormat_ = {};
+    audioByteCount_ = packetCount_ = 0;
 }
 
 std::int32_t CAuFileIO::Open(unsigned char write)
 {
     const std::int32_t wanted = write ? kReadWrite : kReadOnly;
-    if (mFile && mOpenMode == wanted)
+    if (file_ && openMode_ == wanted)
         return kStatusOK;
     Close();
     ResetCounts();
-    mOpenMode = wanted;
-    if (!mFileRef.URL())
+    openMode_ = wanted;
+    if (!fileRef_.URL())
         return kStatusParameterError;
     std::int32_t status = kStatusOK;
-    mFile = AudioFile::open(*mFileRef.URL(), write ? AudioFile::Permission::readWrite : AudioFile::Permission::read, 0,
+    file_ = AudioFile::open(*fileRef_.URL(), write ? AudioFile::Permission::readWrite : AudioFile::Permission::read, 0,
                             &status);
-    if (!mFile)
+    if (!file_)
         return status;
     status = ReadDescription();
     if (status != kStatusOK)
@@ -95,22 +95,22 @@ std::int32_t CAuFileIO::Open(unsigned char write)
 
 std::int32_t CAuFileIO::ReadDescription()
 {
-    std::int32_t status = mFile->dataFormat(mDataFormat);
-    if (status == kStatusOK && !mDataFormat.isLinearPCM())
+    std::int32_t status = file_->dataFormat(dataFormat_);
+    if (status == kStatusOK && !dataFormat_.isLinearPCM())
         status = kNotLinearPCM;
     if (status == kStatusOK)
-        status = mFile->audioDataByteCount(mAudioByteCount);
+        status = file_->audioDataByteCount(audioByteCount_);
     if (status == kStatusOK)
-        status = mFile->audioDataPacketCount(mPacketCount);
+        status = file_->audioDataPacketCount(packetCount_);
     if (status == kStatusOK)
-        mFileType = mFile->fileType();
+        fileType_ = file_->fileType();
     return status;
 }
 
 std::int32_t CAuFileIO::Open(const CFileRef& ref, unsigned char write)
 {
     Close();
-    mFileRef = ref;
+    fileRef_ = ref;
     return Open(write);
 }
 
@@ -123,7 +123,7 @@ std::int32_t CAuFileIO::Open(const platform::FileHandle* handle, unsigned char w
 
 void CAuFileIO::Close()
 {
-    mFile.reset();
+    file_.reset();
 }
 
 void CAuFileIO::CloseFileAndInit()
@@ -143,11 +143,11 @@ std::int32_t CAuFileIO::CreateAndOpen(const CFileRef& ref, long, int channels, i
     if (!file)
         return status;
     ResetCounts();
-    mFile = std::move(file);
-    mDataFormat = format;
-    mFileRef = ref;
-    mFileType = type;
-    mOpenMode = kReadWrite;
+    file_ = std::move(file);
+    dataFormat_ = format;
+    fileRef_ = ref;
+    fileType_ = type;
+    openMode_ = kReadWrite;
     return kStatusOK;
 }
 
@@ -160,45 +160,45 @@ std::int32_t CAuFileIO::CreateAndOpen(const platform::URLRef& url, long reserved
 unsigned int CAuFileIO::SampleRate() const
 {
     constexpr double limit = 4294967296.0;
-    const double rate = mDataFormat.sampleRate;
+    const double rate = dataFormat_.sampleRate;
     return rate >= 0 && rate < limit ? static_cast<unsigned int>(rate) : 0;
 }
 
 std::int64_t CAuFileIO::NumFrames() const
 {
-    return mDataFormat.isLinearPCM() ? BytesToFrames(mAudioByteCount)
-                                     : static_cast<std::int64_t>(mDataFormat.framesPerPacket * mPacketCount);
+    return dataFormat_.isLinearPCM() ? BytesToFrames(audioByteCount_)
+                                     : static_cast<std::int64_t>(dataFormat_.framesPerPacket * packetCount_);
 }
 
 std::int64_t CAuFileIO::FramesToBytes(long frames) const
 {
-    return BytesPerSample() * mDataFormat.channelsPerFrame * frames;
+    return BytesPerSample() * dataFormat_.channelsPerFrame * frames;
 }
 
 std::int64_t CAuFileIO::BytesToFrames(unsigned long long bytes) const
 {
-    const std::int64_t frame = BytesPerSample() * mDataFormat.channelsPerFrame;
+    const std::int64_t frame = BytesPerSample() * dataFormat_.channelsPerFrame;
     return frame > 0 ? static_cast<std::int64_t>(bytes / static_cast<unsigned long long>(frame)) : 0;
 }
 
 bool CAuFileIO::Swapped() const
 {
-    return mDataFormat.bitsPerChannel == 8 ? mFileType == kWAVE
-                                           : (mDataFormat.formatFlags & StreamDescription::isBigEndian) != 0;
+    return dataFormat_.bitsPerChannel == 8 ? fileType_ == kWAVE
+                                           : (dataFormat_.formatFlags & StreamDescription::isBigEndian) != 0;
 }
 
 // Chunks, each the first item of user data with its id.
 
 int CAuFileIO::FindChunk(long id, CChunkData& chunk)
 {
-    if (mOpenMode < 0)
+    if (openMode_ < 0)
         return kNotOpen;
     const auto type = static_cast<FourCC>(id);
     std::uint32_t size = 0;
-    if (!mFile || mFile->userDataSize(type, 0, size) != kStatusOK || size == 0)
+    if (!file_ || file_->userDataSize(type, 0, size) != kStatusOK || size == 0)
         return kNoItem;
     std::unique_ptr<char[]> data(new (std::nothrow) char[size]);
-    const bool isRead = data && mFile->userData(type, 0, size, data.get()) == kStatusOK && size != 0;
+    const bool isRead = data && file_->userData(type, 0, size, data.get()) == kStatusOK && size != 0;
     chunk.data = isRead ? std::move(data) : nullptr;
     chunk.size = isRead ? size : 0;
     chunk.position = chunk.next = isRead ? -1 : 0;
@@ -213,12 +213,12 @@ int CAuFileIO::AddChunk(CChunkData& chunk, unsigned char)
     if (!IsWritable() || chunk.size < 0 || chunk.size > std::int64_t{UINT32_MAX})
         return kNotOpen;
     const auto size = static_cast<std::uint32_t>(chunk.size);
-    return mFile->setUserData(chunk.id, 0, size, chunk.data.get()) == kStatusOK ? kAdded : kNotOpen;
+    return file_->setUserData(chunk.id, 0, size, chunk.data.get()) == kStatusOK ? kAdded : kNotOpen;
 }
 
 std::int32_t CAuFileIO::RemoveChunk(long id)
 {
-    return IsWritable() ? mFile->removeUserData(static_cast<FourCC>(id), 0) : kNotOpen;
+    return IsWritable() ? file_->removeUserData(static_cast<FourCC>(id), 0) : kNotOpen;
 }
 
 bool CAuFileIO::IsVireoLoop()
@@ -229,20 +229,20 @@ bool CAuFileIO::IsVireoLoop()
 
 void CAuFileIO::ByteOrder(int& value) const
 {
-    reverseUnlessWAVE(mFileType, value);
+    reverseUnlessWAVE(fileType_, value);
 }
 
 void CAuFileIO::ByteOrder(short& value) const
 {
-    reverseUnlessWAVE(mFileType, value);
+    reverseUnlessWAVE(fileType_, value);
 }
 
 void CAuFileIO::ByteOrder(unsigned int& value) const
 {
-    reverseUnlessWAVE(mFileType, value);
+    reverseUnlessWAVE(fileType_, value);
 }
 
 void CAuFileIO::ByteOrder(unsigned short& value) const
 {
-    reverseUnlessWAVE(mFileType, value);
+    reverseUnlessWAVE(fileType_, value);
 }

@@ -40,12 +40,12 @@ public:
     std::int32_t CreateAndOpen(const platform::URLRef& url, long, int channels, int bits, long sampleRate,
                                long fileType, const platform::FileHandle*);
 
-    const CFileRef& FileRef() const { return mFileRef; }
-    std::int32_t OpenMode() const { return mOpenMode; }
-    const platform::StreamDescription& DataFormat() const { return mDataFormat; }
-    unsigned int NumChannels() const { return mDataFormat.channelsPerFrame; }
-    unsigned int BitDepth() const { return mDataFormat.bitsPerChannel; }
-    FourCC FileType() const { return mFileType; }
+    const CFileRef& FileRef() const { return fileRef_; }
+    std::int32_t OpenMode() const { return openMode_; }
+    const platform::StreamDescription& DataFormat() const { return dataFormat_; }
+    unsigned int NumChannels() const { return dataFormat_.channelsPerFrame; }
+    unsigned int BitDepth() const { return dataFormat_.bitsPerChannel; }
+    FourCC FileType() const { return fileType_; }
     unsigned int SampleRate() const;
     /// As counted when the file was opened: writing does not change it. 0 for samples of less than a byte.
     std::int64_t NumFrames() const;
@@ -81,19 +81,19 @@ public:
 private:
     void Init();
     void ResetCounts();
-    bool IsWritable() const { return mFile && mOpenMode == kReadWrite; }
+    bool IsWritable() const { return file_ && openMode_ == kReadWrite; }
     std::int32_t ReadDescription();
-    std::int64_t BytesPerSample() const { return mDataFormat.bitsPerChannel / 8; }
+    std::int64_t BytesPerSample() const { return dataFormat_.bitsPerChannel / 8; }
     platform::SampleFormat FileSamples() const;
     /// Whether frames stand in the file as the sample format and the number of channels say.
     bool HasPackedSamples() const;
     std::int32_t ReadSamples(float* dest, std::int64_t startFrame, std::int64_t& frames);
 
-    CFileRef mFileRef;
-    std::unique_ptr<platform::AudioFile> mFile;
-    platform::StreamDescription mDataFormat;
-    std::uint64_t mAudioByteCount;
-    std::uint64_t mPacketCount;
-    FourCC mFileType;
-    std::int32_t mOpenMode;
+    CFileRef fileRef_;
+    std::unique_ptr<platform::AudioFile> file_;
+    platform::StreamDescription dataFormat_;
+    std::uint64_t audioByteCount_;
+    std::uint64_t packetCount_;
+    FourCC fileType_;
+    std::int32_t openMode_;
 };

@@ -28,26 +28,26 @@ platform::SampleFormat CAuFileIO::FileSamples() const
     const int bits = static_cast<int>(std::min<std::int64_t>(BytesPerSample(), 16)) * 8;
     const bool isSwapped = Swapped();
     return {.bits = bits,
-            .isFloat = (mDataFormat.formatFlags & platform::StreamDescription::isFloat) != 0,
+            .isFloat = (dataFormat_.formatFlags & platform::StreamDescription::isFloat) != 0,
             .isUnsigned = bits == 8 && isSwapped,
             .order = isSwapped && bits != 8 ? std::endian::big : std::endian::little};
 }
 
 bool CAuFileIO::HasPackedSamples() const
 {
-    return FileSamples().isSupported() && mDataFormat.channelsPerFrame > 0 &&
-           BytesPerSample() * mDataFormat.channelsPerFrame == mDataFormat.bytesPerPacket;
+    return FileSamples().isSupported() && dataFormat_.channelsPerFrame > 0 &&
+           BytesPerSample() * dataFormat_.channelsPerFrame == dataFormat_.bytesPerPacket;
 }
 
 /// By bytes, as a frame of many channels may be longer than a piece.
 std::int32_t CAuFileIO::ReadSamples(float* dest, std::int64_t startFrame, std::int64_t& frames)
 {
-    if (!mFile)
+    if (!file_)
         return kStatusNotOpen;
     if (!HasPackedSamples())
         return platform::AudioHandle::kFormatNotSupported;
     std::uint64_t there = 0;
-    if (const std::int32_t status = mFile->audioDataPacketCount(there); status != kStatusOK)
+    if (const std::int32_t status = file_->audioDataPacketCount(there); status != kStatusOK)
         return status;
     const auto start = static_cast<std::uint64_t>(startFrame);
     if (start >= there && frames > 0)
@@ -56,13 +56,13 @@ std::int32_t CAuFileIO::ReadSamples(float* dest, std::int64_t startFrame, std::i
 
     const platform::SampleFormat format = FileSamples();
     const auto sampleSize = static_cast<std::uint64_t>(format.bytesPerSample());
-    const std::uint64_t position = start * mDataFormat.bytesPerPacket;
-    const std::uint64_t samples = static_cast<std::uint64_t>(frames) * mDataFormat.channelsPerFrame;
+    const std::uint64_t position = start * dataFormat_.bytesPerPacket;
+    const std::uint64_t samples = static_cast<std::uint64_t>(frames) * dataFormat_.channelsPerFrame;
     Piece piece;
     for (std::uint64_t done = 0; done < samples;) {
         const std::uint64_t count = std::min<std::uint64_t>(samples - done, piece.size() / sampleSize);
         auto bytes = static_cast<std::uint32_t>(count * sampleSize);
-        if (const std::int32_t status = mFile->readBytes(position + done * sampleSize, bytes, piece.data());
+        if (const std::int32_t status = file_->readBytes(position + done * sampleSize, bytes, piece.data());
             status != kStatusOK)
             return status;
         if (bytes != count * sampleSize) // another cut the file meanwhile
@@ -82,22 +82,22 @@ std::int32_t CAuFileIO::ReadFloat(float* dest, long startFrame, long& frames)
     if (status == kStatusOK)
         frames = static_cast<long>(read);
     else
-        std::fill_n(dest, static_cast<std::size_t>(frames) * mDataFormat.channelsPerFrame, 0.0F);
+        std::fill_n(dest, static_cast<std::size_t>(frames) * dataFormat_.channelsPerFrame, 0.0F);
     return status;
 }
 
 std::int32_t CAuFileIO::WriteFloat(float* src, long startFrame, long frames)
 {
-    if (mOpenMode != kReadWrite)
+    if (openMode_ != kReadWrite)
         return kNoWriteAccess;
     if (src == nullptr || startFrame < 0 || frames < 0 || frames > kMaxPackets)
         return kStatusParameterError;
-    if (!mFile)
+    if (!file_)
         return kStatusNotOpen;
     if (!HasPackedSamples())
         return platform::AudioHandle::kFormatNotSupported;
     const platform::SampleFormat format = FileSamples();
-    const auto samples = static_cast<std::size_t>(frames) * mDataFormat.channelsPerFrame;
+    const auto samples = static_cast<std::size_t>(frames) * dataFormat_.channelsPerFrame;
     std::size_t size = 0;
     std::unique_ptr<std::byte[]> scratch;
     if (!__builtin_mul_overflow(samples, static_cast<std::size_t>(format.bytesPerSample()), &size))
@@ -106,12 +106,12 @@ std::int32_t CAuFileIO::WriteFloat(float* src, long startFrame, long frames)
         return kStatusOutOfMemory;
     platform::floatToSamples(src, format, scratch.get(), samples);
     auto packets = static_cast<std::uint32_t>(frames);
-    return mFile->writePackets(static_cast<std::uint64_t>(startFrame), packets, scratch.get());
+    return file_->writePackets(static_cast<std::uint64_t>(startFrame), packets, scratch.get());
 }
 
 std::int32_t CAuFileIO::WriteData(const void* data, long startFrame, long frames)
 {
-    const std::uint32_t bits = mDataFormat.bitsPerChannel, channels = mDataFormat.channelsPerFrame;
+    const std::uint32_t bits = dataFormat_.bitsPerChannel, channels = dataFormat_.channelsPerFrame;
     if (bits < 1)
         return kNoBitDepth;
     const std::int64_t sampleSize = (std::int64_t{bits} + 7) / 8;
@@ -123,8 +123,8 @@ std::int32_t CAuFileIO::WriteData(const void* data, long startFrame, long frames
     if (Swapped()) // the caller's samples stay swapped: callers of old count on it
         platform::swapSamples(const_cast<void*>(data), static_cast<int>(sampleSize),
                               static_cast<std::size_t>(frames) * channels);
-    if (!mFile)
+    if (!file_)
         return kStatusNotOpen;
     auto bytes = static_cast<std::uint32_t>(size);
-    return mFile->writeBytes(static_cast<std::uint64_t>(start), bytes, data);
+    return file_->writeBytes(static_cast<std::uint64_t>(start), bytes, data);
 }

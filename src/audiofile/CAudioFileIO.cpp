@@ -63,7 +63,7 @@ std::int32_t CAudioFileIO::OpenForChunks(const CFileRef& ref, unsigned int permi
     if (status == kStatusOK && HasChunks())
         Describe(permission);
     else if (status == kStatusOK)
-        mInfoStatus = kStatusParameterError;
+        infoStatus_ = kStatusParameterError;
     return status;
 }
 
@@ -84,21 +84,21 @@ std::int32_t CAudioFileIO::OpenUndescribed(const CFileRef& ref, unsigned int per
 void CAudioFileIO::Describe(unsigned int permission)
 {
     auto window = std::make_unique<FileWindow>(*this, IsOpenForWriting() ? GetEOF() : LengthAtOpen());
-    mInfoStatus = DescribeAudioFile(*window, IsMemoryFile() ? nullptr : URL(), mInfo);
-    mReadFailure = window->failure();
+    infoStatus_ = DescribeAudioFile(*window, IsMemoryFile() ? nullptr : URL(), info_);
+    readFailure_ = window->failure();
     if ((permission & (kFileIOReadWrite | kFileIOMemory)) == 0) {
-        mWindow = std::move(window);
-        mWindowStamp = StampAtOpen();
+        window_ = std::move(window);
+        windowStamp_ = StampAtOpen();
     }
-    const bool singleFloats = mInfo.bitsPerSample == 32 && mInfo.floatingPoint;
-    mSampleFormat = singleFloats ? -32 : mInfo.bitsPerSample;
-    if ((permission & kFileIOReadWrite) != 0 && mInfo.IsLinearPCM()) {
+    const bool singleFloats = info_.bitsPerSample == 32 && info_.floatingPoint;
+    sampleFormat_ = singleFloats ? -32 : info_.bitsPerSample;
+    if ((permission & kFileIOReadWrite) != 0 && info_.IsLinearPCM()) {
         // A header with the reservation must be built with it again, or the samples would not stand behind it.
         Header header;
         const auto length = [&](bool option) {
-            return buildHeader(header, mInfo, mInfo.frames, mSampleFormat, option);
+            return buildHeader(header, info_, info_.frames, sampleFormat_, option);
         };
-        mHeaderOption = length(false) != mInfo.dataOffset && length(true) == mInfo.dataOffset;
+        headerOption_ = length(false) != info_.dataOffset && length(true) == info_.dataOffset;
     }
 }
 
@@ -119,13 +119,13 @@ void CAudioFileIO::Init()
 /// All that is known of the file that was open.
 void CAudioFileIO::ForgetFile()
 {
-    mDecoder.reset();
-    mWindow.reset();
-    mInfo = {};
-    mInfoStatus = mReadFailure = kStatusOK;
-    mSampleFormat = 0;
-    mHeaderDirty = false;
-    mHeaderOption = false;
+    decoder_.reset();
+    window_.reset();
+    info_ = {};
+    infoStatus_ = readFailure_ = kStatusOK;
+    sampleFormat_ = 0;
+    headerDirty_ = false;
+    headerOption_ = false;
 }
 
 std::int32_t CAudioFileIO::CreateAndOpenCommon(const CFileRef& ref, long cacheSize, TAudioBusFormat busFormat,
@@ -159,34 +159,34 @@ std::int32_t CAudioFileIO::CreateAndOpenCommon(const CFileRef& ref, long cacheSi
         return status;
     }
     Describe(kFileIOReadWrite);
-    if (busFormat != kAudioBusUndefined && AudioBusFormatChannels(busFormat) == mInfo.channels)
-        mInfo.busFormat = busFormat; // the channel count alone does not tell
-    mHeaderOption = headerOption;
+    if (busFormat != kAudioBusUndefined && AudioBusFormatChannels(busFormat) == info_.channels)
+        info_.busFormat = busFormat; // the channel count alone does not tell
+    headerOption_ = headerOption;
     return cacheSize > 0 ? SetCache(cacheSize * kibibyte) : kStatusOK;
 }
 
 /// The flag outlives a failure: what did not get into the file still has to.
 std::int32_t CAudioFileIO::UpdateHeader()
 {
-    if (!mHeaderDirty)
+    if (!headerDirty_)
         return kStatusOK;
     if (!IsOpenForWriting()) {
-        mHeaderDirty = false;
+        headerDirty_ = false;
         return kStatusOK;
     }
     Header header;
     std::int32_t status = kStatusOK;
-    if (const long length = buildHeader(header, mInfo, mInfo.frames, mSampleFormat, mHeaderOption); length > 0)
+    if (const long length = buildHeader(header, info_, info_.frames, sampleFormat_, headerOption_); length > 0)
         status = Write(header.data(), 0, length);
-    const bool isPadded = mInfo.fileType == kWAVE || mInfo.fileType == kAIFF;
+    const bool isPadded = info_.fileType == kWAVE || info_.fileType == kAIFF;
     if (const long long end = GetEOF(); status == kStatusOK && isPadded && (end & 1) != 0) {
         const char pad = 0;
         status = Write(&pad, end, sizeof pad);
     }
     if (status != kStatusOK)
         return status;
-    mInfo.fileLength = GetEOF();
-    mHeaderDirty = false;
+    info_.fileLength = GetEOF();
+    headerDirty_ = false;
     return kStatusOK;
 }
 
@@ -197,18 +197,18 @@ bool CAudioFileIO::HasBuiltHeader()
 {
     Header built;
     Header stored;
-    for (const bool option : {mHeaderOption, !mHeaderOption}) {
-        for (const std::int64_t frames : {mInfo.frames, std::int64_t{0}}) {
-            const long size = buildHeader(built, mInfo, frames, mSampleFormat, option);
-            if (size <= 0 || size != mInfo.dataOffset || Read(stored.data(), 0, size, nullptr) != kStatusOK)
+    for (const bool option : {headerOption_, !headerOption_}) {
+        for (const std::int64_t frames : {info_.frames, std::int64_t{0}}) {
+            const long size = buildHeader(built, info_, frames, sampleFormat_, option);
+            if (size <= 0 || size != info_.dataOffset || Read(stored.data(), 0, size, nullptr) != kStatusOK)
                 continue;
             // Chunks behind the samples are counted in the container's size, and in the reservation for it.
-            if (mInfo.fileType != kCaff)
+            if (info_.fileType != kCaff)
                 std::copy_n(stored.begin() + 4, 4, built.begin() + 4);
-            if (mInfo.fileType == kWAVE && option)
+            if (info_.fileType == kWAVE && option)
                 std::copy_n(stored.begin() + 20, 8, built.begin() + 20);
             if (std::equal(built.begin(), built.begin() + size, stored.begin())) {
-                mHeaderOption = option;
+                headerOption_ = option;
                 return true;
             }
         }
@@ -221,35 +221,35 @@ std::int32_t CAudioFileIO::SetNumFrames(long frames)
     if (const std::int32_t status = FlushWCache(); status != kStatusOK)
         return status;
     // Building no header, or another one than that which is there, would lose what the file holds.
-    if (!mHeaderDirty && !HasBuiltHeader())
+    if (!headerDirty_ && !HasBuiltHeader())
         return kStatusParameterError;
     Header header;
-    const long length = buildHeader(header, mInfo, frames, mSampleFormat, mHeaderOption);
+    const long length = buildHeader(header, info_, frames, sampleFormat_, headerOption_);
     if (length <= 0)
         return kStatusParameterError;
-    const std::int64_t dataSize = std::int64_t{frames} * mInfo.channels * (mInfo.bitsPerSample / 8);
+    const std::int64_t dataSize = std::int64_t{frames} * info_.channels * (info_.bitsPerSample / 8);
     std::int32_t status = Write(header.data(), 0, length);
     if (status == kStatusOK)
         status = SetEOF(length + dataSize);
     if (status != kStatusOK)
         return status;
-    mInfo.dataOffset = length;
-    mInfo.frames = frames;
-    mInfo.dataSize = dataSize;
-    mInfo.fileLength = length + dataSize;
-    mHeaderDirty = (dataSize & 1) != 0; // Kept: the file is as long as its samples until UpdateHeader pads it
+    info_.dataOffset = length;
+    info_.frames = frames;
+    info_.dataSize = dataSize;
+    info_.fileLength = length + dataSize;
+    headerDirty_ = (dataSize & 1) != 0; // Kept: the file is as long as its samples until UpdateHeader pads it
     return kStatusOK;
 }
 
 void CAudioFileIO::ByteOrder(int* value) const
 {
-    if (mInfo.fileType != kWAVE && value != nullptr)
+    if (info_.fileType != kWAVE && value != nullptr)
         *value = byteSwapped(*value);
 }
 
 void CAudioFileIO::ByteOrder(unsigned int* value) const
 {
-    if (mInfo.fileType != kWAVE && value != nullptr)
+    if (info_.fileType != kWAVE && value != nullptr)
         *value = byteSwapped(*value);
 }
 

@@ -59,12 +59,12 @@ public:
     std::int32_t CreateAndOpenCommon(const CFileRef& ref, long cacheSize, TAudioBusFormat busFormat, int channels,
                                      int bitsPerSample, long sampleRate, unsigned int fileType, bool headerOption);
 
-    const AudioFileInfo& Info() const { return mInfo; }
+    const AudioFileInfo& Info() const { return info_; }
     /// What GetAudioFileInfo gave when the file was opened. After a read that failed the description is not all that
     /// the file holds: nothing is added to such a file, removed from it or cut off.
-    std::int32_t InfoStatus() const { return mInfoStatus; }
+    std::int32_t InfoStatus() const { return infoStatus_; }
     /// Bits per sample; -32 for 32-bit floats.
-    std::int32_t SampleFormat() const { return mSampleFormat; }
+    std::int32_t SampleFormat() const { return sampleFormat_; }
 
     /// "WAVE", "AIFF", "REX2", or 0: what kind of chunked container is open. CAF files have a walk of their own and
     /// give 0.
@@ -172,7 +172,7 @@ public:
     static std::int32_t RemoveCAFChunkFromUUIDChunk(platform::AudioFile& file, const unsigned char* uuid);
 
 private:
-    bool IsOpenCAF() const { return mInfo.fileType == kCaff; }
+    bool IsOpenCAF() const { return info_.fileType == kCaff; }
     std::int32_t ReadCompressedFrames(float* to, long long frame, long count, long& delivered);
     bool HasBuiltHeader();
     std::int32_t PrepareToWrite(long long frame, long count);
@@ -198,13 +198,13 @@ private:
     std::int32_t OpenUndescribed(const CFileRef& ref, unsigned int permission);
     void Describe(unsigned int permission);
 
-    AudioFileInfo mInfo;
-    std::int32_t mInfoStatus = 0;
-    std::int32_t mReadFailure = 0;                        // the one that the description met
-    std::unique_ptr<FileWindow> mWindow;                  // on a file that is open for reading; null otherwise
-    FileStamp mWindowStamp;                               // of the file when the window was opened
-    std::unique_ptr<platform::ConvertingReader> mDecoder; // of compressed data; null until it is read
-    std::int32_t mSampleFormat = 0;
-    bool mHeaderDirty = false;
-    bool mHeaderOption = false;
+    AudioFileInfo info_;
+    std::int32_t infoStatus_ = 0;
+    std::int32_t readFailure_ = 0;                        // the one that the description met
+    std::unique_ptr<FileWindow> window_;                  // on a file that is open for reading; null otherwise
+    FileStamp windowStamp_;                               // of the file when the window was opened
+    std::unique_ptr<platform::ConvertingReader> decoder_; // of compressed data; null until it is read
+    std::int32_t sampleFormat_ = 0;
+    bool headerDirty_ = false;
+    bool headerOption_ = false;
 };

@@ -81,15 +81,15 @@ long long CAudioFileIO::NextChunkHeader(long long position, ChkHeader* current, 
 /// is written to needs a new one each time, which the caller keeps.
 FileWindow& CAudioFileIO::Window(std::optional<FileWindow>& own)
 {
-    if (!mWindow)
+    if (!window_)
         return own.emplace(*this, GetEOF());
     FileStamp now;
-    if (GetStamp(now) == kStatusOK && now != mWindowStamp) {
-        mWindow = std::make_unique<FileWindow>(*this, now.length);
-        mWindowStamp = now;
+    if (GetStamp(now) == kStatusOK && now != windowStamp_) {
+        window_ = std::make_unique<FileWindow>(*this, now.length);
+        windowStamp_ = now;
         SetCache(CacheBlock()); // what it holds is of the file as it was
     }
-    return *mWindow;
+    return *window_;
 }
 
 std::int32_t CAudioFileIO::ForEachChunk(const std::function<bool(const ChunkEntry&)>& visit, ContainerExtent* extent)
@@ -169,8 +169,8 @@ std::int32_t CAudioFileIO::LocateChunk(FourCC id, ChunkEntry& chunk)
 std::int32_t CAudioFileIO::ReadBytes(void* to, const FoundChunk& found)
 {
     constexpr std::int64_t small = 512; // likely in the window with its header
-    if (mWindow && found.size <= small &&
-        mWindow->read(to, static_cast<std::uint64_t>(found.body), static_cast<std::size_t>(found.size)) == kStatusOK)
+    if (window_ && found.size <= small &&
+        window_->read(to, static_cast<std::uint64_t>(found.body), static_cast<std::size_t>(found.size)) == kStatusOK)
         return kStatusOK;
     return Read(to, found.body, static_cast<long>(found.size), nullptr);
 }

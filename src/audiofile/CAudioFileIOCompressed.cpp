@@ -17,7 +17,7 @@ std::int32_t CAudioFileIO::OpenDecoder(platform::Error* error)
 {
     if (!IsOpen())
         return kStatusNotOpen;
-    if (!mInfo.compressed || mDecoder)
+    if (!info_.compressed || decoder_)
         return kStatusOK;
     if (IsMemoryFile())
         return kStatusParameterError;
@@ -31,15 +31,15 @@ std::int32_t CAudioFileIO::OpenDecoder(platform::Error* error)
     if (status = decoder->setClientFormat(floats, error); status != kStatusOK)
         return status;
     constexpr std::uint64_t most = std::numeric_limits<std::int64_t>::max();
-    mInfo.frames = static_cast<std::int64_t>(std::min(decoder->frameCount(), most));
-    mInfo.framesAreStated = false;
-    SetSoundFacts(mInfo, decoder->facts());
-    SetSampleRate(mInfo, found.sampleRate);
-    if (const auto channels = static_cast<std::int32_t>(found.channelsPerFrame); channels != mInfo.channels) {
-        mInfo.channels = channels;
-        mInfo.busFormat = AudioBusFormatForChannels(channels);
+    info_.frames = static_cast<std::int64_t>(std::min(decoder->frameCount(), most));
+    info_.framesAreStated = false;
+    SetSoundFacts(info_, decoder->facts());
+    SetSampleRate(info_, found.sampleRate);
+    if (const auto channels = static_cast<std::int32_t>(found.channelsPerFrame); channels != info_.channels) {
+        info_.channels = channels;
+        info_.busFormat = AudioBusFormatForChannels(channels);
     }
-    mDecoder = std::move(decoder);
+    decoder_ = std::move(decoder);
     return kStatusOK;
 }
 
@@ -47,13 +47,13 @@ std::int32_t CAudioFileIO::ReadCompressedFrames(float* to, long long frame, long
 {
     std::int32_t status = OpenDecoder();
     if (status == kStatusOK)
-        status = mDecoder->seek(frame);
-    const std::uint32_t frameSize = mDecoder ? mDecoder->clientFormat().bytesPerFrame : 0;
+        status = decoder_->seek(frame);
+    const std::uint32_t frameSize = decoder_ ? decoder_->clientFormat().bytesPerFrame : 0;
     while (status == kStatusOK && delivered < count) {
         auto frames = static_cast<std::uint32_t>(std::min(count - delivered, kPieceFrames));
-        platform::AudioBuffer piece{static_cast<std::uint32_t>(mInfo.channels), frames * frameSize,
-                                    to + delivered * mInfo.channels};
-        status = mDecoder->read(frames, {&piece, 1});
+        platform::AudioBuffer piece{static_cast<std::uint32_t>(info_.channels), frames * frameSize,
+                                    to + delivered * info_.channels};
+        status = decoder_->read(frames, {&piece, 1});
         delivered += frames;
         if (status == kStatusOK && frames == 0)
             status = kStatusEndOfFile;

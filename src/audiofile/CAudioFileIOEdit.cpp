@@ -16,8 +16,8 @@ constexpr std::int64_t kCAFOpenEnd = -1;
 /// end among them; and without a description nobody knows where the samples begin.
 std::int32_t CAudioFileIO::PrepareToEdit()
 {
-    if (mReadFailure != kStatusOK)
-        return mReadFailure;
+    if (readFailure_ != kStatusOK)
+        return readFailure_;
     const std::int32_t status = FlushWCache();
     return status != kStatusOK ? status : UpdateHeader();
 }
@@ -30,7 +30,7 @@ std::int32_t CAudioFileIO::AddChunk(unsigned int id, const void* data, long size
         return kStatusParameterError;
     if (const std::int32_t status = PrepareToEdit(); status != kStatusOK)
         return status;
-    ContainerEditor editor(*this, mInfo);
+    ContainerEditor editor(*this, info_);
     if (replace && editor.remove(id) != kStatusOK)
         return kNotRemoved;
     return editor.append(id, BytesView(static_cast<const std::byte*>(data), static_cast<std::size_t>(size)));
@@ -50,7 +50,7 @@ std::int32_t CAudioFileIO::RemoveChunk(unsigned int id)
 {
     if (const std::int32_t status = PrepareToEdit(); status != kStatusOK)
         return status;
-    return ContainerEditor(*this, mInfo).remove(id);
+    return ContainerEditor(*this, info_).remove(id);
 }
 
 std::int32_t CAudioFileIO::PrepareToAppend()
@@ -79,7 +79,7 @@ std::int32_t CAudioFileIO::PrepareToAppend()
         status = SetEOF(tail.end);
     }
     if (status == kStatusOK)
-        mInfo.fileLength = tail.end;
+        info_.fileLength = tail.end;
     return status;
 }
 

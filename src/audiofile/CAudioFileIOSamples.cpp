@@ -33,25 +33,25 @@ std::int32_t CAudioFileIO::ReadFrames(float* to, long long frame, long count, lo
         return kStatusNotOpen;
     if (frame < 0 || count < 0 || (to == nullptr && count > 0))
         return kStatusParameterError;
-    if (mInfo.compressed)
+    if (info_.compressed)
         return ReadCompressedFrames(to, frame, count, delivered);
-    if (!mInfo.IsLinearPCM())
+    if (!info_.IsLinearPCM())
         return kStatusParameterError;
-    const long long there = std::clamp<long long>(mInfo.frames - frame, 0, count);
-    const long long samples = there * mInfo.channels;
-    const int sampleSize = mInfo.sampleFormat.bytesPerSample();
-    const long long start = mInfo.dataOffset + (there > 0 ? frame * mInfo.bytesPerFrame : 0);
+    const long long there = std::clamp<long long>(info_.frames - frame, 0, count);
+    const long long samples = there * info_.channels;
+    const int sampleSize = info_.sampleFormat.bytesPerSample();
+    const long long start = info_.dataOffset + (there > 0 ? frame * info_.bytesPerFrame : 0);
     Piece piece;
     for (long long done = 0; done < samples;) {
         const long long wanted =
-            std::min<long long>(samples - done, static_cast<long long>(samplesInPiece(mInfo.sampleFormat)));
+            std::min<long long>(samples - done, static_cast<long long>(samplesInPiece(info_.sampleFormat)));
         long bytes = 0;
         const std::int32_t status =
             Read(piece.data(), start + done * sampleSize, static_cast<long>(wanted * sampleSize), &bytes);
         const long got = bytes / sampleSize;
-        platform::samplesToFloat(piece.data(), mInfo.sampleFormat, to + done, static_cast<std::size_t>(got));
+        platform::samplesToFloat(piece.data(), info_.sampleFormat, to + done, static_cast<std::size_t>(got));
         done += got;
-        delivered = static_cast<long>(done / mInfo.channels);
+        delivered = static_cast<long>(done / info_.channels);
         if (status != kStatusOK)
             return status;
     }
@@ -64,29 +64,29 @@ std::int32_t CAudioFileIO::WriteFrames(const float* from, long long frame, long 
         return kStatusNotOpen;
     if (!IsOpenForWriting())
         return kStatusWritePermission;
-    if (!mInfo.IsLinearPCM() || frame < 0 || frame > mInfo.frames || count < 0 || (from == nullptr && count > 0))
+    if (!info_.IsLinearPCM() || frame < 0 || frame > info_.frames || count < 0 || (from == nullptr && count > 0))
         return kStatusParameterError;
     if (const std::int32_t status = PrepareToWrite(frame, count); status != kStatusOK)
         return status;
-    const int sampleSize = mInfo.sampleFormat.bytesPerSample();
-    const long long start = mInfo.dataOffset + frame * mInfo.bytesPerFrame;
-    const long long samples = static_cast<long long>(count) * mInfo.channels;
-    const bool extends = start + samples * sampleSize > mInfo.dataOffset + mInfo.dataSize;
+    const int sampleSize = info_.sampleFormat.bytesPerSample();
+    const long long start = info_.dataOffset + frame * info_.bytesPerFrame;
+    const long long samples = static_cast<long long>(count) * info_.channels;
+    const bool extends = start + samples * sampleSize > info_.dataOffset + info_.dataSize;
     std::int32_t status = kStatusOK;
     long long done = 0;
     Piece piece;
     while (done < samples && status == kStatusOK) {
         const long long next =
-            std::min<long long>(samples - done, static_cast<long long>(samplesInPiece(mInfo.sampleFormat)));
-        platform::floatToSamples(from + done, mInfo.sampleFormat, piece.data(), static_cast<std::size_t>(next));
+            std::min<long long>(samples - done, static_cast<long long>(samplesInPiece(info_.sampleFormat)));
+        platform::floatToSamples(from + done, info_.sampleFormat, piece.data(), static_cast<std::size_t>(next));
         status = Write(piece.data(), start + done * sampleSize, static_cast<long>(next * sampleSize));
         if (status == kStatusOK)
             done += next;
     }
-    FramesWritten(frame + done / mInfo.channels);
+    FramesWritten(frame + done / info_.channels);
     if (status != kStatusOK && extends) { // what is left of a frame would pass for a chunk behind the samples
-        SetEOF(mInfo.dataOffset + mInfo.dataSize);
-        mHeaderDirty = true; // the pad byte may be gone
+        SetEOF(info_.dataOffset + info_.dataSize);
+        headerDirty_ = true; // the pad byte may be gone
     }
     return status;
 }
@@ -94,25 +94,25 @@ std::int32_t CAudioFileIO::WriteFrames(const float* from, long long frame, long 
 // Growing needs a header that can say so, room in the container, and nothing behind the samples that would be lost.
 std::int32_t CAudioFileIO::PrepareToWrite(long long frame, long count)
 {
-    const long long capacity = (MaxAudioFileSize(mInfo.fileType, true) - mInfo.dataOffset) / mInfo.bytesPerFrame;
-    if (count <= mInfo.frames - frame)
+    const long long capacity = (MaxAudioFileSize(info_.fileType, true) - info_.dataOffset) / info_.bytesPerFrame;
+    if (count <= info_.frames - frame)
         return kStatusOK;
     if (frame > capacity || count > capacity - frame)
         return kStatusFileTooBig;
-    if (!mHeaderDirty && !HasBuiltHeader())
+    if (!headerDirty_ && !HasBuiltHeader())
         return kStatusParameterError;
-    const long long end = mInfo.dataOffset + (frame + count) * mInfo.bytesPerFrame;
-    if (end > MaxAudioFileSize(mInfo.fileType, mHeaderOption))
+    const long long end = info_.dataOffset + (frame + count) * info_.bytesPerFrame;
+    if (end > MaxAudioFileSize(info_.fileType, headerOption_))
         return kStatusFileTooBig;
-    return end > mInfo.dataOffset + mInfo.dataSize && isFollowed(*this, mInfo) ? kStatusParameterError : kStatusOK;
+    return end > info_.dataOffset + info_.dataSize && isFollowed(*this, info_) ? kStatusParameterError : kStatusOK;
 }
 
 void CAudioFileIO::FramesWritten(long long frames)
 {
-    if (frames <= mInfo.frames)
+    if (frames <= info_.frames)
         return;
-    mInfo.frames = frames;
-    mInfo.dataSize = std::max<std::int64_t>(mInfo.dataSize, frames * mInfo.bytesPerFrame);
-    mInfo.fileLength = std::max<std::int64_t>(mInfo.fileLength, mInfo.dataOffset + mInfo.dataSize);
-    mHeaderDirty = true;
+    info_.frames = frames;
+    info_.dataSize = std::max<std::int64_t>(info_.dataSize, frames * info_.bytesPerFrame);
+    info_.fileLength = std::max<std::int64_t>(info_.fileLength, info_.dataOffset + info_.dataSize);
+    headerDirty_ = true;
 }

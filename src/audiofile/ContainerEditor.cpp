@@ -185,7 +185,8 @@ std::int32_t ContainerEditor::storeSizesOutright(const ContainerChkExtended& hea
 {
     FileWindow window(file_, file_.GetEOF());
     ChunkWalk walk(window, WalkPolicy::asStated);
-    std::int32_t status = walk.begin();
+    walk.beginAs(header);
+    std::int32_t status = kStatusOK;
     while (status == kStatusOK && walk.next()) {
         const platform::WalkedChunk& chunk = walk.chunk();
         if (chunk.field == kSizeElsewhere && chunk.size >= 0 && chunk.size < kSizeElsewhere) {

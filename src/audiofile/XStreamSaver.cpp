@@ -2,27 +2,27 @@
 
 XStreamSaver* XStreamSaver::s_First = nullptr;
 
-XStreamSaver::XStreamSaver(void* stream, const CFileRef& ref) : mNext(s_First), mStream(stream), mRef(ref)
+XStreamSaver::XStreamSaver(void* stream, const CFileRef& ref) : next_(s_First), stream_(stream), ref_(ref)
 {
     s_First = this;
 }
 
 XStreamSaver::~XStreamSaver()
 {
-    for (XStreamSaver** link = &s_First; *link != nullptr; link = &(*link)->mNext) {
+    for (XStreamSaver** link = &s_First; *link != nullptr; link = &(*link)->next_) {
         if (*link == this) {
-            *link = mNext;
+            *link = next_;
             break;
         }
     }
-    if (mStream != nullptr)
-        XStreamClose(mStream);
+    if (stream_ != nullptr)
+        XStreamClose(stream_);
 }
 
 XStreamSaver* XStreamSaver::FindXStreamObject(const CFileRef& ref)
 {
-    for (XStreamSaver* saver = s_First; saver != nullptr; saver = saver->mNext)
-        if (saver->mRef == ref)
+    for (XStreamSaver* saver = s_First; saver != nullptr; saver = saver->next_)
+        if (saver->ref_ == ref)
             return saver;
     return nullptr;
 }

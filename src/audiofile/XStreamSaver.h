@@ -14,10 +14,10 @@ public:
     XStreamSaver(const XStreamSaver&) = delete;
     XStreamSaver& operator=(const XStreamSaver&) = delete;
 
-    XStreamRef GetStream() const { return mStream; }
-    const CFileRef& GetFileRef() const { return mRef; }
+    XStreamRef GetStream() const { return stream_; }
+    const CFileRef& GetFileRef() const { return ref_; }
     /// The saver that was made before, of those that live.
-    XStreamSaver* GetNextXStreamObject() const { return mNext; }
+    XStreamSaver* GetNextXStreamObject() const { return next_; }
 
     static XStreamSaver* GetFirstXStreamObject() { return s_First; }
     /// The latest saver whose reference equals `ref`, or null.
@@ -26,7 +26,7 @@ public:
 private:
     static XStreamSaver* s_First;
 
-    XStreamSaver* mNext;
-    XStreamRef mStream;
-    CFileRef mRef;
+    XStreamSaver* next_;
+    XStreamRef stream_;
+    CFileRef ref_;
 };

@@ -28,7 +28,7 @@ std::int32_t CFileIO::Read(void* buffer, long long position, long count, long* a
         return kStatusOK;
     if (buffer == nullptr || count < 0)
         return kStatusParameterError;
-    if (!mCache || position < 0)
+    if (!cache_ || position < 0)
         return ReadDirect(buffer, position, count, count, &delivered);
 
     delivered = CopyFromCache(buffer, position, count);
@@ -57,7 +57,7 @@ std::int32_t CFileIO::ReadDirect(void* buffer, long long position, long count, l
     *actual = 0;
     while (*actual < enough) {
         const long piece = std::min(count - *actual, kLargestPiece);
-        const std::int64_t got = platform::systemCalls().pread(mDescriptor, static_cast<std::byte*>(buffer) + *actual,
+        const std::int64_t got = platform::systemCalls().pread(descriptor_, static_cast<std::byte*>(buffer) + *actual,
                                                                static_cast<std::size_t>(piece), position + *actual);
         if (got < 0) {
             const int error = errno;
@@ -76,9 +76,9 @@ std::int32_t CFileIO::ReadDirect(void* buffer, long long position, long count, l
 
 std::int32_t CFileIO::Read(void* buffer, long count)
 {
-    const std::int32_t status = Read(buffer, mMark, count, nullptr);
+    const std::int32_t status = Read(buffer, mark_, count, nullptr);
     if (status == kStatusOK)
-        mMark += count;
+        mark_ += count;
     return status;
 }
 
@@ -86,8 +86,8 @@ std::int32_t CFileIO::Read(void* buffer, long* count)
 {
     if (count == nullptr)
         return kStatusParameterError;
-    const std::int32_t status = Read(buffer, mMark, *count, count);
-    mMark += *count;
+    const std::int32_t status = Read(buffer, mark_, *count, count);
+    mark_ += *count;
     return status;
 }
 
@@ -117,9 +117,9 @@ std::int32_t CFileIO::Read(void** data, long* size)
 std::int32_t CFileIO::UnRead(long count)
 {
     long long mark = 0;
-    if (__builtin_sub_overflow(mMark, count, &mark))
+    if (__builtin_sub_overflow(mark_, count, &mark))
         return kStatusParameterError;
-    mMark = std::max(mark, 0LL);
+    mark_ = std::max(mark, 0LL);
     return mark < 0 ? kStatusBeforeStart : kStatusOK;
 }
 
@@ -135,16 +135,16 @@ std::int32_t CFileIO::Write(const void* buffer, long count)
 {
     if (count < 0 || (buffer == nullptr && count > 0))
         return kStatusParameterError;
-    if (count <= mWriteCacheCapacity - Pending()) {
-        std::copy_n(static_cast<const char*>(buffer), count, mWriteCacheFill);
-        mWriteCacheFill += count;
+    if (count <= writeCacheCapacity_ - Pending()) {
+        std::copy_n(static_cast<const char*>(buffer), count, writeCacheFill_);
+        writeCacheFill_ += count;
         return kStatusOK;
     }
     std::int32_t status = FlushWCache();
     if (status == kStatusOK)
-        status = WriteThrough(buffer, mMark, count);
+        status = WriteThrough(buffer, mark_, count);
     if (status == kStatusOK)
-        mMark += count;
+        mark_ += count;
     return status;
 }
 
@@ -153,12 +153,12 @@ std::int32_t CFileIO::WriteThrough(const void* buffer, long long position, long 
 {
     if (IsMemoryFile())
         return WriteToMemory(buffer, position, count);
-    mCacheLength = 0;
+    cacheLength_ = 0;
     HintAtNoReuse(std::min(position, kWorthAHint) + count);
     for (long written = 0; written < count;) {
         const long piece = std::min(count - written, kLargestPiece);
         const std::int64_t put =
-            platform::systemCalls().pwrite(mDescriptor, static_cast<const std::byte*>(buffer) + written,
+            platform::systemCalls().pwrite(descriptor_, static_cast<const std::byte*>(buffer) + written,
                                            static_cast<std::size_t>(piece), position + written);
         if (put == 0)
             return kStatusDiskFull;
@@ -172,10 +172,10 @@ std::int32_t CFileIO::WriteThrough(const void* buffer, long long position, long 
 /// Tells the system, once, that the bytes of a file so long will not be wanted again soon.
 void CFileIO::HintAtNoReuse(long long length)
 {
-    if (mIsHinted || length < kWorthAHint)
+    if (isHinted_ || length < kWorthAHint)
         return;
-    mIsHinted = true;
-    platform::systemCalls().adviseNoReuse(mDescriptor);
+    isHinted_ = true;
+    platform::systemCalls().adviseNoReuse(descriptor_);
 }
 
 /// Kept: growing goes by way of SetEOF, so that a mark beyond the new end moves there, and nothing written beyond the
@@ -187,19 +187,19 @@ std::int32_t CFileIO::WriteToMemory(const void* buffer, long long position, long
     long long end = 0;
     if (__builtin_add_overflow(position, count, &end))
         return kStatusFileTooBig;
-    if (!mCache || end > static_cast<long long>(mCache->size())) {
+    if (!cache_ || end > static_cast<long long>(cache_->size())) {
         const std::int32_t status = SetEOF(end);
         if (status != kStatusOK)
             return status;
     }
     if (count > 0)
-        std::memcpy(mCache->data() + position, buffer, static_cast<std::size_t>(count));
+        std::memcpy(cache_->data() + position, buffer, static_cast<std::size_t>(count));
     return kStatusOK;
 }
 
 std::int32_t CFileIO::Flush()
 {
-    if (mDescriptor >= 0 && platform::systemCalls().fsync(mDescriptor) != 0)
+    if (descriptor_ >= 0 && platform::systemCalls().fsync(descriptor_) != 0)
         return PosixErrorToOSErr();
     return kStatusOK;
 }
@@ -217,11 +217,11 @@ std::int32_t CFileIO::GetEOF(long long* length) const
         return kStatusParameterError;
     *length = 0;
     if (IsMemoryFile()) {
-        *length = mCache ? static_cast<long long>(mCache->size()) : 0;
+        *length = cache_ ? static_cast<long long>(cache_->size()) : 0;
         return kStatusOK;
     }
     platform::FileStatus status;
-    if (!platform::systemCalls().status(mDescriptor, &status))
+    if (!platform::systemCalls().status(descriptor_, &status))
         return PosixErrorToOSErr();
     *length = status.size;
     return kStatusOK;
@@ -233,7 +233,7 @@ std::int32_t CFileIO::GetStamp(FileStamp& stamp) const
     if (IsMemoryFile())
         return GetEOF(&stamp.length);
     platform::FileStatus status;
-    if (!platform::systemCalls().status(mDescriptor, &status))
+    if (!platform::systemCalls().status(descriptor_, &status))
         return PosixErrorToOSErr();
     stamp = {status.size, status.changed};
     return kStatusOK;
@@ -246,14 +246,14 @@ std::int32_t CFileIO::SetEOF(long long length)
         if (status != kStatusOK)
             return status;
     } else {
-        mCacheLength = 0; // it may hold bytes that are cut off
+        cacheLength_ = 0; // it may hold bytes that are cut off
         HintAtNoReuse(length);
-        while (platform::systemCalls().ftruncate(mDescriptor, length) != 0) {
+        while (platform::systemCalls().ftruncate(descriptor_, length) != 0) {
             if (errno != EINTR)
                 return PosixErrorToOSErr();
         }
     }
-    mMark = std::min(mMark, length);
+    mark_ = std::min(mark_, length);
     return kStatusOK;
 }
 
@@ -261,11 +261,11 @@ std::int32_t CFileIO::ResizeMemory(long long length)
 {
     if (length < 0)
         return kStatusParameterError;
-    if (!mCache)
-        mCache = std::make_shared<KTMem>();
-    if (!mCache->reallocate(static_cast<std::size_t>(length)))
+    if (!cache_)
+        cache_ = std::make_shared<KTMem>();
+    if (!cache_->reallocate(static_cast<std::size_t>(length)))
         return kStatusOutOfMemory;
-    mCacheLength = length;
+    cacheLength_ = length;
     return kStatusOK;
 }
 
@@ -273,7 +273,7 @@ std::int32_t CFileIO::Allocate(long long length, bool preallocate)
 {
     long long end = 0;
     const bool isReserved = preallocate && !IsMemoryFile() && GetEOF(&end) == kStatusOK &&
-                            platform::systemCalls().preallocate(mDescriptor, end, length) == 0;
+                            platform::systemCalls().preallocate(descriptor_, end, length) == 0;
     const std::int32_t status = SetEOF(length);
     // As much as the file held before is reserved beyond its new end; to be set to the length it has gives that back.
     return status == kStatusOK && isReserved && end > 0 ? SetEOF(length) : status;

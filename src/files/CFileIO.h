@@ -80,8 +80,8 @@ public:
     long long GetEOF() const;
     std::int32_t GetEOF(long long* length) const;
     /// The length that Open met, which costs nothing; a file that others write may have another by now.
-    long long LengthAtOpen() const { return mStampAtOpen.length; }
-    const FileStamp& StampAtOpen() const { return mStampAtOpen; }
+    long long LengthAtOpen() const { return stampAtOpen_.length; }
+    const FileStamp& StampAtOpen() const { return stampAtOpen_; }
     /// The state now, by one call of the system; of a memory file its length.
     std::int32_t GetStamp(FileStamp& stamp) const;
     /// Cuts the file or extends it with zeros; a mark beyond `length` moves there.
@@ -95,8 +95,8 @@ public:
     /// The CRC-32 from the mark on, over as many bytes as the file is long; 0xFFFFFFFF when they are not there.
     std::uint32_t CRC();
 
-    long long GetMark() const { return mMark; }
-    void SetMark(long long mark) { mMark = mark; }
+    long long GetMark() const { return mark_; }
+    void SetMark(long long mark) { mark_ = mark; }
 
     /// The read cache, empty and of `size` bytes; in memory mode the content: `size` zeros.
     std::int32_t SetCache(long size);
@@ -110,11 +110,11 @@ public:
     /// Pending bytes are lost.
     void DeAllocWCache();
 
-    bool IsOpen() const { return mDescriptor >= 0 || (IsMemoryFile() && mCache != nullptr); }
-    bool IsMemoryFile() const { return (mMode & kFileIOMemory) != 0; }
-    bool IsOpenForWriting() const { return IsOpen() && (mMode & kFileIOReadWrite) != 0; }
-    unsigned int Mode() const { return mMode; }
-    const std::shared_ptr<KTMem>& CacheBlock() const { return mCache; }
+    bool IsOpen() const { return descriptor_ >= 0 || (IsMemoryFile() && cache_ != nullptr); }
+    bool IsMemoryFile() const { return (mode_ & kFileIOMemory) != 0; }
+    bool IsOpenForWriting() const { return IsOpen() && (mode_ & kFileIOReadWrite) != 0; }
+    unsigned int Mode() const { return mode_; }
+    const std::shared_ptr<KTMem>& CacheBlock() const { return cache_; }
 
 private:
     std::int32_t OpenFile(const CFileRef& ref, unsigned int mode);
@@ -135,19 +135,19 @@ private:
     std::int32_t ReserveBehind(long long end, long long size);
     std::int32_t ReadPiece(void* buffer, long long position, long count);
     void AdoptWriteCache(std::unique_ptr<char[]> buffer, long long size);
-    long long Pending() const { return mWriteCacheFill - mWriteCache.get(); }
+    long long Pending() const { return writeCacheFill_ - writeCache_.get(); }
 
     static constexpr long long kWorthAHint = 1 << 20; // what is smaller crowds nothing out of the system's cache
 
-    std::int32_t mDescriptor = -1;
-    long long mCacheOffset = 0;
-    long long mCacheLength = 0; // valid bytes; of a memory file, its length
-    std::shared_ptr<KTMem> mCache;
-    long long mMark = 0; // of bytes in the write cache, the offset at which they belong
-    std::unique_ptr<char[]> mWriteCache;
-    char* mWriteCacheFill = nullptr;
-    long long mWriteCacheCapacity = 0;
-    unsigned int mMode = 0;
-    FileStamp mStampAtOpen;
-    bool mIsHinted = false; // of the open file
+    std::int32_t descriptor_ = -1;
+    long long cacheOffset_ = 0;
+    long long cacheLength_ = 0; // valid bytes; of a memory file, its length
+    std::shared_ptr<KTMem> cache_;
+    long long mark_ = 0; // of bytes in the write cache, the offset at which they belong
+    std::unique_ptr<char[]> writeCache_;
+    char* writeCacheFill_ = nullptr;
+    long long writeCacheCapacity_ = 0;
+    unsigned int mode_ = 0;
+    FileStamp stampAtOpen_;
+    bool isHinted_ = false; // of the open file
 };

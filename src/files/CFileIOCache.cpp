@@ -8,12 +8,12 @@
 long CFileIO::CopyFromCache(void* buffer, long long position, long count) const
 {
     // Another owner of the block may have made it smaller.
-    const long long held = std::min(mCacheLength, static_cast<long long>(mCache->size()));
-    const long long skip = position - mCacheOffset;
-    if (position < mCacheOffset || skip >= held)
+    const long long held = std::min(cacheLength_, static_cast<long long>(cache_->size()));
+    const long long skip = position - cacheOffset_;
+    if (position < cacheOffset_ || skip >= held)
         return 0;
     const auto copied = static_cast<std::size_t>(std::min<long long>(count, held - skip));
-    std::memcpy(buffer, mCache->data() + skip, copied);
+    std::memcpy(buffer, cache_->data() + skip, copied);
     return static_cast<long>(copied);
 }
 
@@ -21,15 +21,15 @@ long CFileIO::CopyFromCache(void* buffer, long long position, long count) const
 /// beyond the end of the file holds what there is. A request that the block cannot hold leaves it as it is.
 bool CFileIO::Refill(long long position, long needed)
 {
-    const auto size = static_cast<long>(mCache->size());
+    const auto size = static_cast<long>(cache_->size());
     if (needed > size)
         return false;
-    mCacheLength = 0;
+    cacheLength_ = 0;
     long filled = 0;
-    if (ReadDirect(mCache->data(), position, size, needed, &filled) != kStatusOK)
+    if (ReadDirect(cache_->data(), position, size, needed, &filled) != kStatusOK)
         return false;
-    mCacheOffset = position;
-    mCacheLength = filled;
+    cacheOffset_ = position;
+    cacheLength_ = filled;
     return true;
 }
 
@@ -42,9 +42,9 @@ std::int32_t CFileIO::SetCache(long size)
 
 std::int32_t CFileIO::SetCache(const std::shared_ptr<KTMem>& block)
 {
-    mCache = block;
-    mCacheOffset = 0;
-    mCacheLength = IsMemoryFile() && block ? static_cast<long long>(block->size()) : 0;
+    cache_ = block;
+    cacheOffset_ = 0;
+    cacheLength_ = IsMemoryFile() && block ? static_cast<long long>(block->size()) : 0;
     return kStatusOK;
 }
 
@@ -77,9 +77,9 @@ std::int32_t CFileIO::SetWCache(char* buffer, long size)
 
 void CFileIO::AdoptWriteCache(std::unique_ptr<char[]> buffer, long long size)
 {
-    mWriteCache = std::move(buffer);
-    mWriteCacheFill = mWriteCache.get();
-    mWriteCacheCapacity = size;
+    writeCache_ = std::move(buffer);
+    writeCacheFill_ = writeCache_.get();
+    writeCacheCapacity_ = size;
 }
 
 void CFileIO::DeAllocWCache()
@@ -92,10 +92,10 @@ std::int32_t CFileIO::FlushWCache()
     const auto pending = static_cast<long>(Pending());
     if (pending == 0)
         return kStatusOK;
-    const std::int32_t status = WriteThrough(mWriteCache.get(), mMark, pending);
+    const std::int32_t status = WriteThrough(writeCache_.get(), mark_, pending);
     if (status != kStatusOK)
         return status;
-    mMark += pending;
-    mWriteCacheFill = mWriteCache.get();
+    mark_ += pending;
+    writeCacheFill_ = writeCache_.get();
     return kStatusOK;
 }

@@ -73,7 +73,7 @@ std::int32_t CFileIO::MoveDown(long long from, long long distance, long long len
 /// Asks for the space first: a disk that turned out to be full in the middle of a move would leave the file torn.
 std::int32_t CFileIO::ReserveBehind(long long end, long long size)
 {
-    if (IsMemoryFile() || platform::systemCalls().preallocate(mDescriptor, end, size) == 0)
+    if (IsMemoryFile() || platform::systemCalls().preallocate(descriptor_, end, size) == 0)
         return kStatusOK;
     return errno == ENOSPC || errno == EDQUOT ? PosixErrorToOSErr() : kStatusOK; // else: not every file system can
 }

@@ -57,7 +57,7 @@ void CFileIO::Init()
     CloseDescriptor();
     DeAllocWCache();
     ResetCache();
-    mMark = 0;
+    mark_ = 0;
     CFileRef::ReInit();
 }
 
@@ -74,11 +74,11 @@ std::int32_t CFileIO::Open(const CFileRef& ref, unsigned int mode)
     CFileRef::ReInit();
 
     if ((mode & kFileIOMemory) != 0) {
-        if (!mCache)
-            mCache = std::make_shared<KTMem>();
-        mCacheLength = static_cast<long long>(mCache->size());
-        mStampAtOpen = {mCacheLength, 0};
-        mMode = mode;
+        if (!cache_)
+            cache_ = std::make_shared<KTMem>();
+        cacheLength_ = static_cast<long long>(cache_->size());
+        stampAtOpen_ = {cacheLength_, 0};
+        mode_ = mode;
         return kStatusOK;
     }
     const std::int32_t status = OpenFile(ref, mode);
@@ -134,9 +134,9 @@ std::int32_t CFileIO::OpenStepByStep(const CFileRef& ref, unsigned int mode)
 
 void CFileIO::Adopt(int descriptor, const FileStamp& stamp, unsigned int mode)
 {
-    mDescriptor = descriptor;
-    mStampAtOpen = stamp;
-    mMode = mode;
+    descriptor_ = descriptor;
+    stampAtOpen_ = stamp;
+    mode_ = mode;
     HintAtNoReuse(stamp.length);
 }
 
@@ -144,7 +144,7 @@ std::int32_t CFileIO::Close()
 {
     const std::int32_t flushed = FlushWCache();
     DeAllocWCache();
-    mCacheOffset = mCacheLength = 0;
+    cacheOffset_ = cacheLength_ = 0;
     const std::int32_t closed = CloseDescriptor();
     CFileRef::ReInit();
     return flushed != kStatusOK ? flushed : closed;
@@ -154,17 +154,17 @@ std::int32_t CFileIO::Close()
 std::int32_t CFileIO::CloseDescriptor()
 {
     std::int32_t status = kStatusOK;
-    if (mDescriptor >= 0 && platform::systemCalls().close(mDescriptor) != 0)
+    if (descriptor_ >= 0 && platform::systemCalls().close(descriptor_) != 0)
         status = PosixErrorToOSErr();
-    mDescriptor = -1;
-    mMode = 0;
-    mStampAtOpen = {};
-    mIsHinted = false;
+    descriptor_ = -1;
+    mode_ = 0;
+    stampAtOpen_ = {};
+    isHinted_ = false;
     return status;
 }
 
 void CFileIO::ForgetPosition()
 {
-    mMark = 0;
-    mCacheOffset = mCacheLength = 0;
+    mark_ = 0;
+    cacheOffset_ = cacheLength_ = 0;
 }

@@ -28,7 +28,7 @@ CFileRef::CFileRef(URLRef url)
     Set(std::move(url));
 }
 
-CFileRef::CFileRef(const CFileRef& other) : mURL(other.mURL), mValid(other.mValid)
+CFileRef::CFileRef(const CFileRef& other) : url_(other.url_), valid_(other.valid_)
 {
 }
 
@@ -36,8 +36,8 @@ CFileRef& CFileRef::operator=(const CFileRef& other)
 {
     if (this != &other) {
         ReInit();
-        mURL = other.mURL;
-        mValid = other.mValid;
+        url_ = other.url_;
+        valid_ = other.valid_;
     }
     return *this;
 }
@@ -46,9 +46,9 @@ CFileRef::~CFileRef() = default;
 
 void CFileRef::ReInit()
 {
-    mURL.reset();
-    mValid = false;
-    mFileHandle.reset();
+    url_.reset();
+    valid_ = false;
+    fileHandle_.reset();
 }
 
 // Setters take what they need before they reset: the argument may be this reference's own path, or its own URL.
@@ -83,12 +83,12 @@ bool CFileRef::Set(const String& folder, const String& name)
 
 bool CFileRef::Set(URLRef url)
 {
-    if (mValid && url == mURL)
+    if (valid_ && url == url_)
         return true;
     ReInit();
-    mURL = std::move(url);
-    mValid = mURL != nullptr;
-    return mValid;
+    url_ = std::move(url);
+    valid_ = url_ != nullptr;
+    return valid_;
 }
 
 bool CFileRef::Set(const URLRef& url, bool isDirectory)
@@ -99,7 +99,7 @@ bool CFileRef::Set(const URLRef& url, bool isDirectory)
 
 bool CFileRef::Set(const CFileRef& other, bool isDirectory)
 {
-    return Set(other.mURL, isDirectory);
+    return Set(other.url_, isDirectory);
 }
 
 bool CFileRef::Set(const platform::FileHandle* handle)

@@ -90,8 +90,8 @@ public:
     /// would have 1,024 bytes or more.
     bool ReplaceExtensionBy(const std::string& ext);
 
-    bool IsValid() const { return mValid; }
-    const platform::URLRef& URL() const { return mURL; }
+    bool IsValid() const { return valid_; }
+    const platform::URLRef& URL() const { return url_; }
 
     /// The path without trailing slashes, owned by the URL: valid until the reference changes. Null when there is none:
     /// for a relative URL, and one of another host or scheme.
@@ -153,7 +153,7 @@ public:
 private:
     bool SetTildePath(const platform::String& path, bool isDirectory);
 
-    platform::URLRef mURL;
-    bool mValid = false;
-    std::unique_ptr<platform::FileHandle> mFileHandle; // cache of UpdateInternalFSRef; null is all zero
+    platform::URLRef url_;
+    bool valid_ = false;
+    std::unique_ptr<platform::FileHandle> fileHandle_; // cache of UpdateInternalFSRef; null is all zero
 };

@@ -15,7 +15,7 @@ constexpr const char* kURLKey = "CFileRef_URL";
 
 std::optional<platform::Dictionary> CFileRef::CreatePList(tCFileRefPListCreationType type) const
 {
-    const URLRef url = platform::filePathURL(mURL);
+    const URLRef url = platform::filePathURL(url_);
     if (!url)
         return std::nullopt;
     platform::Dictionary plist;

@@ -37,9 +37,9 @@ std::string_view withoutLeadingDot(std::string_view extension)
 const char* CFileRef::GetPath() const
 {
     // A URL with a base has a path, yet not one of its own; one of another host or scheme has none.
-    if (!mValid || !mURL->hasAbsolutePath() || mURL->posixPath().empty())
+    if (!valid_ || !url_->hasAbsolutePath() || url_->posixPath().empty())
         return nullptr;
-    return mURL->posixPath().c_str();
+    return url_->posixPath().c_str();
 }
 
 bool CFileRef::GetPath(char* buffer, unsigned int size) const
@@ -63,10 +63,10 @@ CFileRef::operator std::string() const
 
 String CFileRef::CopyFileSystemPath(tPathStyle style) const
 {
-    if (!mValid)
+    if (!valid_)
         return nullptr;
     // Kept: asking for the colon style gives the Windows form
-    return mURL->copyFileSystemPath(style == kPOSIXPathStyle ? PathStyle::posix : PathStyle::windows);
+    return url_->copyFileSystemPath(style == kPOSIXPathStyle ? PathStyle::posix : PathStyle::windows);
 }
 
 bool CFileRef::AddToPath(const char* component, bool isDirectory)
@@ -76,9 +76,9 @@ bool CFileRef::AddToPath(const char* component, bool isDirectory)
 
 bool CFileRef::AddToPath(const String& component, bool isDirectory)
 {
-    if (!mValid || component.isNull())
+    if (!valid_ || component.isNull())
         return SetTildePath(component, isDirectory);
-    const std::string& folder = mURL->posixPath();
+    const std::string& folder = url_->posixPath();
     if (folder.empty())
         return Set(URLRef());
     return SetTildePath(String::fromUTF8(folder + '/' + component.utf8()), isDirectory);
@@ -86,16 +86,16 @@ bool CFileRef::AddToPath(const String& component, bool isDirectory)
 
 bool CFileRef::AddToPath(const CFileRef& other)
 {
-    if (!mValid || !other.mValid)
+    if (!valid_ || !other.valid_)
         return Set(URLRef());
-    return AddToPath(other.CopyFileName(), other.mURL->hasDirectoryPath());
+    return AddToPath(other.CopyFileName(), other.url_->hasDirectoryPath());
 }
 
 bool CFileRef::SetToParent()
 {
-    if (!mValid)
+    if (!valid_)
         return false;
-    const URLRef parent = mURL->deletingLastPathComponent();
+    const URLRef parent = url_->deletingLastPathComponent();
     if (!parent || parent->posixPath().empty() || parent->posixPath() == ".")
         return Set(URLRef());
     return Set(parent, true);
@@ -109,19 +109,19 @@ bool CFileRef::ReplaceName(const char* name, bool isDirectory)
 bool CFileRef::ReplaceName(const String& name, bool isDirectory)
 {
     // Without a name the result would be the parent, passed off as the item.
-    if (name.isEmpty() || (!mValid && isDirectory))
+    if (name.isEmpty() || (!valid_ && isDirectory))
         return Set(URLRef());
-    if (!mValid)
+    if (!valid_)
         return SetTildePath(name, false);
-    const URLRef parent = mURL->deletingLastPathComponent();
+    const URLRef parent = url_->deletingLastPathComponent();
     return Set(parent ? parent->appendingPathComponent(name, isDirectory) : nullptr);
 }
 
 bool CFileRef::ReplaceName(const CFileRef& other)
 {
-    if (!other.mValid)
+    if (!other.valid_)
         return Set(URLRef());
-    return ReplaceName(other.CopyFileName(), other.mURL->hasDirectoryPath());
+    return ReplaceName(other.CopyFileName(), other.url_->hasDirectoryPath());
 }
 
 bool CFileRef::ReplaceExtensionBy(const std::string& ext)
@@ -141,7 +141,7 @@ bool CFileRef::ReplaceExtensionBy(const std::string& ext)
 
 String CFileRef::CopyFileName() const
 {
-    return mValid ? mURL->copyLastPathComponent() : nullptr;
+    return valid_ ? url_->copyLastPathComponent() : nullptr;
 }
 
 bool CFileRef::GetFileName(char* buffer, long size) const
@@ -154,9 +154,9 @@ bool CFileRef::GetFileName(char* buffer, long size) const
 
 bool CFileRef::UnicodeFileName(UnicodeName* name) const
 {
-    if (name == nullptr || !mValid)
+    if (name == nullptr || !valid_)
         return false;
-    String text = mFileHandle ? platform::catalogName(*mFileHandle) : nullptr;
+    String text = fileHandle_ ? platform::catalogName(*fileHandle_) : nullptr;
     if (text.isNull())
         text = CopyFileName();
     const std::u16string units = text.utf16();
@@ -194,7 +194,7 @@ bool CFileRef::GetExtension(char* buffer, unsigned long size) const
 
 String CFileRef::CopyFileExtension() const
 {
-    return mValid ? mURL->copyPathExtension() : nullptr;
+    return valid_ ? url_->copyPathExtension() : nullptr;
 }
 
 bool CFileRef::HasExtension(const std::string& ext) const

@@ -39,9 +39,9 @@ String resolvedPath(const CFileRef& ref)
 
 String CFileRef::GetDisplayName() const
 {
-    if (!mValid)
+    if (!valid_)
         return nullptr;
-    String name = platform::displayName(*mURL);
+    String name = platform::displayName(*url_);
     return name.isNull() ? CopyFileName() : name;
 }
 
@@ -52,7 +52,7 @@ String CFileRef::CopyDisplayName() const
 
 std::shared_ptr<const Bytes> CFileRef::GetVolumeID() const
 {
-    return mValid ? platform::volumeIdentifier(*mURL) : nullptr;
+    return valid_ ? platform::volumeIdentifier(*url_) : nullptr;
 }
 
 CFileRef CFileRef::GetMountPoint() const
@@ -129,14 +129,14 @@ bool CFileRef::PathContains(const CFileRef& other) const
 
 bool CFileRef::ResolveAlias(bool allowUserInteraction)
 {
-    if (!mValid)
+    if (!valid_)
         return false;
-    if (const auto bookmark = platform::bookmarkOfAliasFile(*mURL)) {
+    if (const auto bookmark = platform::bookmarkOfAliasFile(*url_)) {
         const auto resolved = platform::resolveBookmark(*bookmark, {.withoutUserInterface = !allowUserInteraction});
         // Kept: the target of a stale bookmark is not trusted
         const URLRef target = resolved.isStale ? nullptr : platform::filePathURL(resolved.url);
         if (target) {
-            if (*target != *mURL)
+            if (*target != *url_)
                 Set(target);
             return true;
         }
@@ -144,8 +144,8 @@ bool CFileRef::ResolveAlias(bool allowUserInteraction)
     FileStatus status;
     if (!linkStatusOf(*this, status))
         return false;
-    const URLRef target = platform::resolvingSymbolicLinks(*mURL);
-    if (!target || target->posixPath() == mURL->posixPath())
+    const URLRef target = platform::resolvingSymbolicLinks(*url_);
+    if (!target || target->posixPath() == url_->posixPath())
         return false;
     return Set(target);
 }
@@ -163,24 +163,24 @@ bool CFileRef::UpdateInternalFSRef()
     auto handle = std::make_unique<platform::FileHandle>();
     if (!GetFSRef(handle.get()))
         handle.reset();
-    mFileHandle = std::move(handle);
-    return mFileHandle != nullptr;
+    fileHandle_ = std::move(handle);
+    return fileHandle_ != nullptr;
 }
 
 bool operator==(const CFileRef& a, const CFileRef& b)
 {
-    if (!a.mValid || !b.mValid)
-        return a.mValid == b.mValid;
-    const std::string& path = a.mURL->posixPath();
-    if (!path.empty() && path == b.mURL->posixPath())
+    if (!a.valid_ || !b.valid_)
+        return a.valid_ == b.valid_;
+    const std::string& path = a.url_->posixPath();
+    if (!path.empty() && path == b.url_->posixPath())
         return true; // one text leads to one item
     return resolvedPath(a) == resolvedPath(b);
 }
 
 bool operator<(const CFileRef& a, const CFileRef& b)
 {
-    if (!a.mValid || !b.mValid)
-        return a.mValid;
+    if (!a.valid_ || !b.valid_)
+        return a.valid_;
     return resolvedPath(a) < resolvedPath(b);
 }
 
@@ -191,8 +191,8 @@ std::size_t CFileRef::hash() const
 
 void CFileRef::Trace() const
 {
-    if (!mValid)
+    if (!valid_)
         std::puts("(invalid)");
     else
-        std::printf("%s (state: %s)\n", mURL->posixPath().c_str(), Exists() ? "existing" : "not existing");
+        std::printf("%s (state: %s)\n", url_->posixPath().c_str(), Exists() ? "existing" : "not existing");
 }

@@ -28,9 +28,9 @@ const char* PMNameException::what() const noexcept
     return reason_;
 }
 
-PMName::PMName(std::string_view text) : mText(NewText(text.size()))
+PMName::PMName(std::string_view text) : text_(NewText(text.size()))
 {
-    std::copy(text.begin(), text.end(), mText.get());
+    std::copy(text.begin(), text.end(), text_.get());
 }
 
 PMName::PMName(const char* text)
@@ -45,13 +45,13 @@ PMName::PMName(const PMName& other) : PMName(other.Get())
 
 PMName& PMName::operator=(PMName other) noexcept
 {
-    mText = std::move(other.mText);
+    text_ = std::move(other.text_);
     return *this;
 }
 
 std::string_view PMName::View() const
 {
-    return mText ? std::string_view(mText.get()) : std::string_view();
+    return text_ ? std::string_view(text_.get()) : std::string_view();
 }
 
 void PMName::Cat(const char* text)
@@ -62,7 +62,7 @@ void PMName::Cat(const char* text)
     const std::string_view old = View();
     auto joined = NewText(old.size() + added.size());
     std::copy(added.begin(), added.end(), std::copy(old.begin(), old.end(), joined.get()));
-    mText = std::move(joined);
+    text_ = std::move(joined);
 }
 
 void PMName::GetElements(char separator, std::list<PMName>& out) const
@@ -113,6 +113,6 @@ std::int32_t PMName::FromFile(CFileIO& file, unsigned char shortLength)
     auto text = NewText(static_cast<std::size_t>(length));
     status = file.Read(text.get(), static_cast<long>(length));
     if (status == kStatusOK)
-        mText = std::move(text);
+        text_ = std::move(text);
     return status;
 }

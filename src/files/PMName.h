@@ -31,7 +31,7 @@ public:
     ~PMName() = default;
 
     /// NUL-terminated, owned by the name until it changes; null for a null name.
-    const char* Get() const { return mText.get(); }
+    const char* Get() const { return text_.get(); }
     operator const char*() const { return Get(); }
 
     /// Appends; nothing for null or empty text.
@@ -50,5 +50,5 @@ public:
 private:
     std::string_view View() const;
 
-    std::unique_ptr<char[]> mText;
+    std::unique_ptr<char[]> text_;
 };

@@ -36,21 +36,21 @@ std::string nameWithoutExtension(const CFileRef& ref)
 } // namespace
 
 CFileServer::CFileServer(int maxFiles)
-    : mFiles(static_cast<std::size_t>(std::max(maxFiles, 0)), kTContainerValueCallbacks),
-      mMaxFiles(maxFiles)
+    : files_(static_cast<std::size_t>(std::max(maxFiles, 0)), kTContainerValueCallbacks),
+      maxFiles_(maxFiles)
 {
 }
 
 CFileServer::~CFileServer()
 {
-    while (!mClientIds.empty())
-        UnRegister(mClientIds.back());
+    while (!clientIds_.empty())
+        UnRegister(clientIds_.back());
 }
 
 unsigned int CFileServer::CreateNewClientId() const
 {
     unsigned int id = 1;
-    for (const unsigned int taken : mClientIds) {
+    for (const unsigned int taken : clientIds_) {
         if (taken != id)
             break;
         ++id;
@@ -60,14 +60,14 @@ unsigned int CFileServer::CreateNewClientId() const
 
 TContainer* CFileServer::Find(const CFileRef* ref) const
 {
-    return ref != nullptr ? mFiles.find(ref->URL()) : nullptr;
+    return ref != nullptr ? files_.find(ref->URL()) : nullptr;
 }
 
 void CFileServer::AddClientId(unsigned int clientId)
 {
-    const auto place = std::lower_bound(mClientIds.begin(), mClientIds.end(), clientId);
-    if (place == mClientIds.end() || *place != clientId)
-        mClientIds.insert(place, clientId);
+    const auto place = std::lower_bound(clientIds_.begin(), clientIds_.end(), clientId);
+    if (place == clientIds_.end() || *place != clientId)
+        clientIds_.insert(place, clientId);
 }
 
 unsigned int CFileServer::Register(unsigned int clientId, const CFileRef* ref)
@@ -78,7 +78,7 @@ unsigned int CFileServer::Register(unsigned int clientId, const CFileRef* ref)
         AddClientId(clientId);
         return Retain(clientId, *known);
     }
-    if (mMaxFiles <= 0 || mFiles.size() >= static_cast<std::size_t>(mMaxFiles))
+    if (maxFiles_ <= 0 || files_.size() >= static_cast<std::size_t>(maxFiles_))
         return kRefused;
     auto container = std::make_unique<TContainer>();
     container->ref = *ref;
@@ -86,22 +86,22 @@ unsigned int CFileServer::Register(unsigned int clientId, const CFileRef* ref)
         return 0;
     container->clientIds = {clientId};
     AddClientId(clientId);
-    mFiles.set(ref->URL(), container.release());
+    files_.set(ref->URL(), container.release());
     return 1;
 }
 
 unsigned int CFileServer::UnRegister(unsigned int clientId)
 {
-    std::erase(mClientIds, clientId);
-    mRefs.clear();
-    for (TContainer* container : mFiles)
+    std::erase(clientIds_, clientId);
+    refs_.clear();
+    for (TContainer* container : files_)
         if (Release(clientId, *container) == 0) {
             Close(*container);
-            mRefs.push_back(container->ref);
+            refs_.push_back(container->ref);
         }
-    for (const CFileRef& ref : mRefs)
-        mFiles.remove(ref.URL());
-    mRefs.clear();
+    for (const CFileRef& ref : refs_)
+        files_.remove(ref.URL());
+    refs_.clear();
     return 0;
 }
 
@@ -149,11 +149,11 @@ TFileInfo CFileServer::GetFileInfo(const CFileRef* ref) const
 
 const std::vector<TFileInfo>& CFileServer::GetFileInfoVector(unsigned int clientId)
 {
-    mFileInfos.clear();
-    for (const TContainer* container : mFiles)
+    fileInfos_.clear();
+    for (const TContainer* container : files_)
         if (contains(container->clientIds, clientId))
-            mFileInfos.push_back(infoOf(*container));
-    return mFileInfos;
+            fileInfos_.push_back(infoOf(*container));
+    return fileInfos_;
 }
 
 /// Kept: a stereo file that is held as mono has other channels than any file, and is never the one.
@@ -162,7 +162,7 @@ TContainer* CFileServer::FindReplaced(const CFileRef& newFile, const char* name)
     if (newFile.HasExtension(kUnloadedExtension))
         return nullptr;
     CAudioFileIO file;
-    for (TContainer* container : mFiles) {
+    for (TContainer* container : files_) {
         if (container->ref.CopyFileName().utf8() != name)
             continue;
         if (!file.IsOpen() && (file.Open(newFile, 0) != kStatusOK || file.OpenDecoder() != kStatusOK))
@@ -188,9 +188,9 @@ std::vector<unsigned int> CFileServer::UpdateAudioFileInfo(const CFileRef* newFi
         return {}; // others read that one's samples
     oldFile = container->ref;
     kTContainerValueCallbacks.retain(container);
-    mFiles.remove(oldFile.URL());
+    files_.remove(oldFile.URL());
     container->ref = replacement;
-    mFiles.set(replacement.URL(), container);
+    files_.set(replacement.URL(), container);
     std::vector<unsigned int> clients = container->clientIds;
     kTContainerValueCallbacks.release(container);
     return clients;
@@ -198,7 +198,7 @@ std::vector<unsigned int> CFileServer::UpdateAudioFileInfo(const CFileRef* newFi
 
 const TContainer* CFileServer::FirstOf(unsigned int clientId) const
 {
-    for (const TContainer* container : mFiles)
+    for (const TContainer* container : files_)
         if (contains(container->clientIds, clientId))
             return container;
     return nullptr;
@@ -228,7 +228,7 @@ unsigned int CFileServer::MaxClientId(std::vector<unsigned int>& ids) const
 
 void CFileServer::SwapClients(unsigned int a, unsigned int b)
 {
-    for (TContainer* container : mFiles) {
+    for (TContainer* container : files_) {
         std::vector<unsigned int>& ids = container->clientIds;
         const auto first = std::find(ids.begin(), ids.end(), a);
         const auto second = std::find(ids.begin(), ids.end(), b);

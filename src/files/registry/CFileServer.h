@@ -71,9 +71,9 @@ private:
     const TContainer* FirstOf(unsigned int clientId) const;
     TContainer* FindReplaced(const CFileRef& newFile, const char* name) const;
 
-    FileTable mFiles;
-    std::vector<TFileInfo> mFileInfos;
-    std::vector<CFileRef> mRefs;          // of files about to be removed
-    std::vector<unsigned int> mClientIds; // ascending, each once
-    std::int32_t mMaxFiles;
+    FileTable files_;
+    std::vector<TFileInfo> fileInfos_;
+    std::vector<CFileRef> refs_;          // of files about to be removed
+    std::vector<unsigned int> clientIds_; // ascending, each once
+    std::int32_t maxFiles_;
 };

@@ -103,8 +103,8 @@ private:
 bool MDOverview::HasRoomAt(long start) const
 {
     // Kept: a start just behind the last point is accepted, although nothing of it can be stored.
-    return mBlock != nullptr && mBlock->size() >= kOverviewHeaderSize && start >= 0 &&
-           static_cast<std::size_t>(start / kPointFrames) <= OverviewPoints(*mBlock);
+    return block_ != nullptr && block_->size() >= kOverviewHeaderSize && start >= 0 &&
+           static_cast<std::size_t>(start / kPointFrames) <= OverviewPoints(*block_);
 }
 
 template <class Fold>
@@ -113,31 +113,31 @@ void MDOverview::AddFrames(long start, long frames, Fold fold)
     long end = 0;
     if (!HasRoomAt(start) || frames < 0 || __builtin_add_overflow(start, frames, &end))
         return;
-    if (start != mNextFrame) {
-        mMinimum = mMaximum = 0;
-        mMissingFrames = static_cast<std::int32_t>(kPointFrames - start % kPointFrames);
+    if (start != nextFrame_) {
+        minimum_ = maximum_ = 0;
+        missingFrames_ = static_cast<std::int32_t>(kPointFrames - start % kPointFrames);
     }
-    mNextFrame = end;
+    nextFrame_ = end;
 
-    OverviewPoint* points = OverviewPointsOf(*mBlock);
-    const std::size_t count = OverviewPoints(*mBlock);
+    OverviewPoint* points = OverviewPointsOf(*block_);
+    const std::size_t count = OverviewPoints(*block_);
     auto point = static_cast<std::size_t>(start / kPointFrames);
     for (long done = 0; done < frames;) {
-        const long part = std::min<long>(frames - done, mMissingFrames);
+        const long part = std::min<long>(frames - done, missingFrames_);
         const Extremes extremes = fold(done, part);
-        mMinimum = std::max(std::min(mMinimum, extremes.lowest), -kHighest);
-        mMaximum = std::min(std::max(mMaximum, extremes.highest), kHighest);
+        minimum_ = std::max(std::min(minimum_, extremes.lowest), -kHighest);
+        maximum_ = std::min(std::max(maximum_, extremes.highest), kHighest);
         if (point < count)
-            points[point] = {static_cast<std::int8_t>(mMinimum), static_cast<std::int8_t>(mMaximum)};
+            points[point] = {static_cast<std::int8_t>(minimum_), static_cast<std::int8_t>(maximum_)};
         done += part;
-        mMissingFrames -= static_cast<std::int32_t>(part);
-        if (mMissingFrames == 0) {
+        missingFrames_ -= static_cast<std::int32_t>(part);
+        if (missingFrames_ == 0) {
             point = std::min(point + 1, count);
-            mMinimum = mMaximum = 0;
-            mMissingFrames = kPointFrames;
+            minimum_ = maximum_ = 0;
+            missingFrames_ = kPointFrames;
         }
     }
-    SetOverviewFrames(*mBlock, static_cast<std::int64_t>(point) * kPointFrames);
+    SetOverviewFrames(*block_, static_cast<std::int64_t>(point) * kPointFrames);
 }
 
 void MDOverview::Add(const std::int8_t* samples, long start, long frames, int channels, int stride, int firstByte)
@@ -171,43 +171,43 @@ void MDOverview::AddStored(const void* samples, platform::SampleFormat format, l
 void MDOverview::AddRough(const float* samples, long frames)
 {
     constexpr std::int16_t callsPerPeak = 16;
-    if (mBlock == nullptr || mBlock->size() < kOverviewHeaderSize || samples == nullptr || frames < 0)
+    if (block_ == nullptr || block_->size() < kOverviewHeaderSize || samples == nullptr || frames < 0)
         return;
-    if (mRoughFrame == 0)
-        mRoughFrame = mNextFrame;
-    if (mRoughFrame < 1 || mRoughFrame < mNextFrame)
+    if (roughFrame_ == 0)
+        roughFrame_ = nextFrame_;
+    if (roughFrame_ < 1 || roughFrame_ < nextFrame_)
         return;
-    if (--mRoughCountdown < 1) {
-        mRoughCountdown = callsPerPeak;
-        mRoughPeak = 0;
+    if (--roughCountdown_ < 1) {
+        roughCountdown_ = callsPerPeak;
+        roughPeak_ = 0;
     }
-    OverviewPoint* points = OverviewPointsOf(*mBlock);
-    const auto count = static_cast<std::int64_t>(OverviewPoints(*mBlock));
-    std::int64_t point = mRoughFrame / kPointFrames;
-    long missing = kPointFrames - static_cast<long>(mRoughFrame % kPointFrames);
+    OverviewPoint* points = OverviewPointsOf(*block_);
+    const auto count = static_cast<std::int64_t>(OverviewPoints(*block_));
+    std::int64_t point = roughFrame_ / kPointFrames;
+    long missing = kPointFrames - static_cast<long>(roughFrame_ % kPointFrames);
     for (long done = 0; done < frames && point < count; ++point) {
         const long part = std::min(frames - done, missing);
         float highest = 0;
         for (long i = done; i < done + part; ++i)
             highest = samples[i] > highest ? samples[i] : highest; // a NaN is passed over
         const auto peak = static_cast<std::int8_t>(std::min(highest * kHighest, static_cast<float>(kHighest)));
-        mRoughPeak = std::max(mRoughPeak, peak);
-        if (mRoughPeak > points[point].maximum)
-            points[point] = {static_cast<std::int8_t>(-mRoughPeak), mRoughPeak};
+        roughPeak_ = std::max(roughPeak_, peak);
+        if (roughPeak_ > points[point].maximum)
+            points[point] = {static_cast<std::int8_t>(-roughPeak_), roughPeak_};
         done += part;
         missing = kPointFrames;
-        SetOverviewFrames(*mBlock, (point + 1) * kPointFrames);
+        SetOverviewFrames(*block_, (point + 1) * kPointFrames);
     }
-    mRoughFrame += frames;
+    roughFrame_ += frames;
 }
 
 KTMem* MDOverview::Finalize()
 {
-    KTMem* block = mBlock;
-    mBlock = nullptr;
+    KTMem* block = block_;
+    block_ = nullptr;
     if (block == nullptr || block->size() < kOverviewHeaderSize)
         return block;
-    SetOverviewFrames(*block, mNextFrame);
-    block->reallocate(std::min(block->size(), OverviewBlockSize(mNextFrame)));
+    SetOverviewFrames(*block, nextFrame_);
+    block->reallocate(std::min(block->size(), OverviewBlockSize(nextFrame_)));
     return block;
 }

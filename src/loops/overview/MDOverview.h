@@ -15,7 +15,7 @@ public:
     /// Frames of floats, and of stored samples, with more channels are not taken.
     static constexpr int kMostChannels = 2048;
 
-    explicit MDOverview(KTMem* block) : mBlock(block) {}
+    explicit MDOverview(KTMem* block) : block_(block) {}
     MDOverview(const MDOverview&) = delete;
     MDOverview& operator=(const MDOverview&) = delete;
 
@@ -41,12 +41,12 @@ private:
     template <class Fold>
     void AddFrames(long start, long frames, Fold fold);
 
-    std::int32_t mMinimum = 0; // of the open point
-    std::int32_t mMaximum = 0;
-    std::int32_t mMissingFrames = static_cast<std::int32_t>(kOverviewFramesPerPoint); // in the open point
-    std::int8_t mRoughPeak = 0;
-    std::int16_t mRoughCountdown = 0;
-    KTMem* mBlock;
-    std::int64_t mNextFrame = 0;
-    std::int64_t mRoughFrame = 0;
+    std::int32_t minimum_ = 0; // of the open point
+    std::int32_t maximum_ = 0;
+    std::int32_t missingFrames_ = static_cast<std::int32_t>(kOverviewFramesPerPoint); // in the open point
+    std::int8_t roughPeak_ = 0;
+    std::int16_t roughCountdown_ = 0;
+    KTMem* block_;
+    std::int64_t nextFrame_ = 0;
+    std::int64_t roughFrame_ = 0;
 };

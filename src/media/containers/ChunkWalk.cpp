@@ -55,8 +55,9 @@ std::int64_t nextChunkHeader(HeaderWindow& window, const ContainerChkExtended& h
 {
     const auto length = static_cast<std::int64_t>(window.length());
     const auto read = [&](std::int64_t at) {
-        const bool isThere = at >= 0 && window.get(next, static_cast<std::uint64_t>(at));
-        return isThere ? std::int32_t{kStatusOK} : at < 0 ? std::int32_t{kStatusEndOfFile} : window.reason();
+        if (at < 0)
+            return std::int32_t{kStatusParameterError};
+        return window.get(next, static_cast<std::uint64_t>(at)) ? std::int32_t{kStatusOK} : window.reason();
     };
     std::int64_t size = 0;
     std::int64_t candidate = sizeof(ContainerChk);
@@ -103,6 +104,13 @@ std::int32_t ChunkWalk::begin()
     return isChunked() ? beginChunked() : std::int32_t{kStatusOK};
 }
 
+void ChunkWalk::beginAs(const ContainerChkExtended& header)
+{
+    container_ = {&traitsOf(ContainerKind::riff), header.id, header.formType, header};
+    containerSize_ = header.EffectiveSize();
+    setStatedEnd();
+}
+
 std::int32_t ChunkWalk::beginChunked()
 {
     const std::byte* start = window_.at(0, sizeof(ContainerChk));
@@ -122,15 +130,19 @@ std::int32_t ChunkWalk::beginChunked()
         }
         containerSize_ = container_.header.EffectiveSize();
     }
-    const auto length = static_cast<std::int64_t>(window_.length());
-    const bool fills = containerSize_ > length - kAheadOfSize;
-    statedEnd_ = fills ? length : containerSize_ + kAheadOfSize;
+    setStatedEnd();
     const bool isSigned = container_.traits->kind == ContainerKind::iff;
     if (field == kSizeElsewhere && !isSigned && !container_.header.HasValidDs64())
         containerSize_ = 0;
-    if (!fills && containerSize_ > 0)
+    if (containerSize_ > 0)
         limit_ = static_cast<std::uint64_t>(statedEnd_);
     return kStatusOK;
+}
+
+void ChunkWalk::setStatedEnd()
+{
+    const auto length = static_cast<std::int64_t>(window_.length());
+    statedEnd_ = containerSize_ > length - kAheadOfSize ? length : containerSize_ + kAheadOfSize;
 }
 
 bool ChunkWalk::next()
@@ -152,8 +164,8 @@ bool ChunkWalk::nextBySteps()
     const std::int64_t position = following_;
     if (error == kStatusOK)
         following_ = nextChunkHeader(window_, container_.header, position, current, ahead_, error);
-    const bool readsNothing = current.id == 0 && current.size == 0;
-    if (error != kStatusOK && error != kStatusEndOfFile && !readsNothing) {
+    // A parameter error is that of zeros, and of a size that leads to ahead of the file.
+    if (error != kStatusOK && error != kStatusEndOfFile && error != kStatusParameterError) {
         status_ = error;
         return false;
     }

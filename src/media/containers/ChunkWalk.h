@@ -58,6 +58,8 @@ public:
     /// Reads the start. 0; kStatusParameterError for a file that is none of the containers; kStatusEndOfFile for one
     /// that ends in its header; the status of a read that failed.
     std::int32_t begin();
+    /// Begins without reading, as stated, in WAVE whose header stands in memory and may no longer stand in the file.
+    void beginAs(const ContainerChkExtended& header);
     const Container& container() const { return container_; }
     /// Where the chunks end by what the container states, at most the length of the file. Negative where a signed size
     /// is.
@@ -90,6 +92,7 @@ public:
 private:
     bool isChunked() const { return container_.traits->chunkHeaderSize == sizeof(ChkHeader); }
     std::int32_t beginChunked();
+    void setStatedEnd();
     const std::byte* readHeader(std::uint64_t position);
     std::int64_t statedSize(const std::byte* header);
     std::uint64_t padded(std::uint64_t end);

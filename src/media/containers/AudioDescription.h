@@ -27,6 +27,12 @@ struct AudioDescription {
     std::uint64_t byteCount() const;
 };
 
+/// What the packet table of a CAF file counts.
+struct PacketCounts {
+    std::int64_t packets = 0;
+    std::int64_t frames = 0; // without those that prime the decoder and fill its last packet
+};
+
 /// Makes a description of the chunks of a container, which it meets in file order. Does not own the window.
 class AudioDescriber {
 public:
@@ -39,11 +45,6 @@ public:
     AudioDescription description() const;
 
 private:
-    struct PacketTable {
-        std::int64_t packets = 0;
-        std::int64_t frames = 0; // without those that prime the decoder and fill its last packet
-    };
-
     bool isLikeWAVE() const;
     void readFormat(const WalkedChunk& chunk);
     void locateSound(const WalkedChunk& chunk);
@@ -59,7 +60,7 @@ private:
     bool metFormat_ = false;     // a chunk of that id, if only the start of one
     std::uint32_t speakers_ = 0; // of CAF
     std::optional<std::uint32_t> factFrames_;
-    std::optional<PacketTable> packetTable_;
+    std::optional<PacketCounts> packetTable_;
 };
 
 /// The same of a container that was scanned. kStatusIOError when format or samples are missing, or contradict each

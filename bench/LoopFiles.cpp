@@ -1,8 +1,8 @@
 #include "LoopFiles.h"
 
-#include "media/containers/ContainerHeaders.h"
 #include "loops/VireoLoopChunksManager.h"
 #include "loops/tagging/Chunks.h"
+#include "media/containers/ContainerHeaders.h"
 #include "platform/core/ByteWriter.h"
 
 #include <fcntl.h>

@@ -43,7 +43,8 @@ std::string walkOf(const Memory& file, WalkPolicy policy)
     std::int64_t end = 0;
     while (walk.next()) {
         const WalkedChunk& chunk = walk.chunk();
-        text += (chunk.id != 0 ? fourCCText(chunk.id) : "zeros") + ":" + (chunk.size == INT64_MAX ? "open" : std::to_string(chunk.size)) + " ";
+        text += (chunk.id != 0 ? fourCCText(chunk.id) : "zeros") + ":" +
+                (chunk.size == INT64_MAX ? "open" : std::to_string(chunk.size)) + " ";
         end = walk.following();
     }
     if (policy == WalkPolicy::toTheSound)

@@ -2,8 +2,8 @@
 
 #include "audiofile/AudioFileHeader.h"
 #include "audiofile/AudioFileLimits.h"
-#include "media/containers/ContainerHeaders.h"
 #include "files/AudioFileTypes.h"
+#include "media/containers/ContainerHeaders.h"
 #include "tool/shared/output/Failure.h"
 
 #include <fmt/format.h>

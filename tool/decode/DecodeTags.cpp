@@ -1,9 +1,9 @@
 #include "tool/decode/DecodeTags.h"
 
 #include "audiofile/CAudioFileIO.h"
-#include "media/containers/ContainerHeaders.h"
 #include "loops/tagging/CAFPayloads.h"
 #include "loops/tagging/ChunkIDs.h"
+#include "media/containers/ContainerHeaders.h"
 #include "media/containers/ContainerTraits.h"
 #include "tool/shared/input/InputFile.h"
 #include "tool/shared/looptags/LoopTagFields.h"

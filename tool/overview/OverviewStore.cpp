@@ -1,8 +1,8 @@
 #include "tool/overview/OverviewStore.h"
 
 #include "audiofile/ContainerChanges.h"
-#include "media/containers/ContainerHeaders.h"
 #include "loops/overview/StoredOverview.h"
+#include "media/containers/ContainerHeaders.h"
 #include "tool/shared/edits/EditProblems.h"
 #include "tool/shared/input/InputFile.h"
 #include "tool/shared/output/Failure.h"

@@ -10,8 +10,8 @@
 namespace platform {
 
 struct FLACInfo {
-    StreamDescription format;     // "flac"
-    std::uint64_t frames = 0;     // no more than blocks of the smallest size can hold
+    StreamDescription format; // "flac"
+    std::uint64_t frames = 0; // no more than blocks of the smallest size can hold
     std::uint64_t statedFrames = 0;
     bool framesAreStated = false; // the last frame does not prove them
     std::uint32_t speakers = 0;   // that the channels feed, as bits of WAVE's channel mask

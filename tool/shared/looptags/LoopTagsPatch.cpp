@@ -1,7 +1,7 @@
 #include "tool/shared/looptags/LoopTagsPatch.h"
 
-#include "media/containers/ContainerHeaders.h"
 #include "loops/VireoLoopFileInfoChunkDataTypes.h"
+#include "media/containers/ContainerHeaders.h"
 #include "platform/String.h"
 #include "tool/shared/looptags/LoopTagsLayouts.h"
 

@@ -1,7 +1,7 @@
 // The CAF side of LoopTagsPatch.
-#include "media/containers/ContainerHeaders.h"
 #include "loops/VireoLoopCombinedTagsChunkDataTypes.h"
 #include "loops/VireoLoopTerms.h"
+#include "media/containers/ContainerHeaders.h"
 #include "tool/shared/looptags/CAFTextPairs.h"
 #include "tool/shared/looptags/LoopTagsLayouts.h"
 

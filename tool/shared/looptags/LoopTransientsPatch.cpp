@@ -1,6 +1,6 @@
 // The transients' side of LoopTagsPatch.
-#include "media/containers/ContainerHeaders.h"
 #include "loops/tagging/Chunks.h"
+#include "media/containers/ContainerHeaders.h"
 #include "tool/shared/looptags/LoopTagsPatch.h"
 
 #include <algorithm>

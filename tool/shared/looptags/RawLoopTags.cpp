@@ -1,8 +1,8 @@
 #include "tool/shared/looptags/RawLoopTags.h"
 
-#include "media/containers/ContainerHeaders.h"
 #include "loops/VireoLoopCombinedTagsChunkData.h"
 #include "loops/VireoLoopUserDataUtils.h"
+#include "media/containers/ContainerHeaders.h"
 #include "platform/core/Status.h"
 #include "tool/shared/output/Failure.h"
 

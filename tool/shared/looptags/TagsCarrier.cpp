@@ -1,7 +1,7 @@
 #include "tool/shared/looptags/TagsCarrier.h"
 
-#include "media/containers/ContainerHeaders.h"
 #include "loops/VireoLoopFileInfoChunkDataTypes.h"
+#include "media/containers/ContainerHeaders.h"
 #include "platform/String.h"
 #include "tool/shared/looptags/LoopTagsEdit.h"
 #include "tool/shared/output/Failure.h"

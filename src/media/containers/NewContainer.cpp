@@ -65,7 +65,8 @@ void writeFormatChunk(ByteWriter& out, const NewContainer& file)
     constexpr std::array<std::uint8_t, 14> tagGUID{0, 0, 0, 0, 0x10, 0, 0x80, 0, 0, 0xAA, 0, 0x38, 0x9B, 0x71};
     const StreamDescription& format = file.format;
     const std::uint16_t tag = isFloat(file) ? tagFloat : tagPCM;
-    const bool extensible = format.channelsPerFrame > 2 || (!isFloat(file) && format.bitsPerChannel > 16);
+    const bool extensible =
+        file.speakers && (format.channelsPerFrame > 2 || (!isFloat(file) && format.bitsPerChannel > 16));
     const auto rate = static_cast<std::uint32_t>(std::llround(format.sampleRate));
     const auto bits = static_cast<std::uint16_t>(format.bitsPerChannel);
     out.writeFourCC(fourCC("fmt "));
@@ -79,7 +80,7 @@ void writeFormatChunk(ByteWriter& out, const NewContainer& file)
     if (extensible) {
         out.write<std::uint16_t>(22);
         out.write(bits); // all of them valid
-        out.write(file.speakers);
+        out.write(*file.speakers);
         out.write(tag);
         out.write(std::as_bytes(std::span(tagGUID)));
     } else if (isFloat(file)) {
@@ -201,11 +202,11 @@ Bytes headerOfCAF(const NewContainer& file)
     out.write<std::uint32_t>(1); // frame in a packet
     out.write(format.channelsPerFrame);
     out.write(format.bitsPerChannel);
-    if (format.channelsPerFrame > 2 && file.speakers != 0) {
+    if (const std::uint32_t speakers = file.speakers.value_or(0); format.channelsPerFrame > 2 && speakers != 0) {
         out.writeFourCC(fourCC("chan"));
         out.write<std::int64_t>(12);
         out.write(layoutBySpeakers);
-        out.write(file.speakers);
+        out.write(speakers);
         out.write<std::uint32_t>(0); // no further descriptions
     }
     fillUp(out, file, sizeof(CAFChunkHeader) + editCountSize);

@@ -5,6 +5,7 @@
 #include "platform/core/Bytes.h"
 
 #include <cstdint>
+#include <optional>
 
 namespace platform {
 
@@ -14,8 +15,10 @@ struct NewContainer {
     /// without floats, AIFC has no little-endian floats; 8 bits are unsigned in WAVE, signed elsewhere, whatever is
     /// said.
     StreamDescription format;
-    std::uint32_t speakers = 0; // that the channels feed, as bits of WAVE's channel mask; 0 when it is open
-    std::uint64_t frames = 0;   // that will follow
+    /// That the channels feed, as bits of WAVE's channel mask; 0 says that they feed none in particular. Without it
+    /// WAVE has the plain format chunk, which says nothing of speakers.
+    std::optional<std::uint32_t> speakers;
+    std::uint64_t frames = 0; // that will follow
     bool isCounted = true; // in a "fact" where the format asks for one; whoever adds frames later cannot keep it true
     bool hasReservation = false; // of WAVE: room ("JUNK") to grow past 4 GiB; makes it RF64 once it has
     std::size_t dataOffset = 0;  // filler makes the samples begin here; 0 for none

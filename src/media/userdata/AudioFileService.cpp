@@ -92,8 +92,12 @@ std::unique_ptr<AudioFile> AudioFile::create(const URL& url, FourCC fileType, co
     std::int32_t& result = status != nullptr ? *status : ignored;
     const std::string path = pathOf(url);
     // Samples begin on a page, and filler ahead of them is for user data to come.
-    const Bytes content = headerOf(
-        {.fileType = fileType, .format = format, .isCounted = false, .hasReservation = true, .dataOffset = 4096});
+    const Bytes content = headerOf({.fileType = fileType,
+                                    .format = format,
+                                    .speakers = std::nullopt,
+                                    .isCounted = false,
+                                    .hasReservation = true,
+                                    .dataOffset = 4096});
     if (path.empty() || content.empty()) {
         result = kStatusParameterError;
         return nullptr;

@@ -1,29 +1,18 @@
-# A thin front: CMake presets do the work, scripts/setup installs what they need.
-JOBS ?= $(shell nproc)
+# A thin front: scripts/build installs what is missing and builds a CMake preset; scripts/run and scripts/test are all that is needed.
+export JOBS ?= $(shell nproc)
 PREFIX ?= /usr/local
 FUZZ_SECONDS ?= 60
 
 .PHONY: all run test asan tsan check stress bench fuzz install package clean
 
 all:
-	@scripts/setup build
-	@cmake --preset release >/dev/null
-	cmake --build --preset release -j $(JOBS)
+	@scripts/build release
 
-run: all
-	@examples/run build/release/tool/ktfiles
-
-test:
-	@scripts/setup build test bench package
-	@cmake --preset test $(CMAKE_FLAGS) >/dev/null
-	cmake --build --preset test -j $(JOBS)
-	ctest --preset test
+run test:
+	@scripts/$@
 
 asan tsan:
-	@scripts/setup build test bench package
-	@cmake --preset $@ $(CMAKE_FLAGS) >/dev/null
-	cmake --build --preset $@ -j $(JOBS)
-	ctest --preset $@
+	@scripts/test $@
 
 # How the sources are laid out, and what clang-tidy finds in them.
 check:
@@ -40,15 +29,11 @@ stress:
 	KTFILES_KILLS=5000 build/test/tests/test_coordination --gtest_filter='KillTest.*'
 
 bench:
-	@scripts/setup build bench
-	@cmake --preset bench >/dev/null
-	cmake --build --preset bench -j $(JOBS)
+	@scripts/build bench
 	build/bench/bench/ktfiles_bench
 
 fuzz:
-	@scripts/setup build fuzz
-	@cmake --preset fuzz >/dev/null
-	cmake --build --preset fuzz -j $(JOBS)
+	@scripts/build fuzz
 	@scripts/fuzz build/fuzz/fuzz $(FUZZ_SECONDS)
 
 install: all
@@ -56,8 +41,7 @@ install: all
 
 package:
 	@scripts/setup build package
-	@cmake --preset release >/dev/null
-	cmake --build --preset release -j $(JOBS)
+	@scripts/build release
 	cd build/release && cpack -G DEB
 	@ls -l build/release/*.deb
 

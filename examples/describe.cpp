@@ -2,13 +2,15 @@
 #include "audiofile/CAudioFileIO.h"
 
 #include <cstdio>
+#include <filesystem>
 
 namespace {
 
 bool describe(const char* path)
 {
     CAudioFileIO file;
-    const std::int32_t status = file.Open(CFileRef(path, false), 0);
+    const std::string absolute = std::filesystem::absolute(path); // a CFileRef knows no working folder
+    const std::int32_t status = file.Open(CFileRef(absolute.c_str(), false), 0);
     if (status != kStatusOK) {
         std::fprintf(stderr, "%s: %s\n", path, StatusText(status));
         return false;

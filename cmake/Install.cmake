@@ -52,3 +52,5 @@ install(TARGETS ktfiles RUNTIME DESTINATION ${CMAKE_INSTALL_BINDIR} COMPONENT co
 install(FILES tool/ktfiles.1 DESTINATION ${CMAKE_INSTALL_MANDIR}/man1 COMPONENT command)
 install(FILES tool/ktfiles.bash DESTINATION ${CMAKE_INSTALL_DATADIR}/bash-completion/completions RENAME ktfiles
     COMPONENT command)
+# The files that the examples of the man page name.
+install(DIRECTORY examples/media/ DESTINATION ${CMAKE_INSTALL_DATADIR}/doc/ktfiles/examples COMPONENT command USE_SOURCE_PERMISSIONS)

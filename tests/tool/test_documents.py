@@ -1,0 +1,125 @@
+"""What README.md and the man page tell people to type, typed: every example works as it stands, and shows what they say."""
+import difflib
+import fcntl
+import filecmp
+import os
+import pathlib
+import re
+import shutil
+import struct
+import subprocess
+import termios
+import unittest
+
+from command import KTFILES, MEDIA, CommandTest, needs_decoders
+
+ROOT = pathlib.Path(__file__).resolve().parents[2]
+README = (ROOT / "README.md").read_text(encoding="utf-8")
+OMITTED = "⋮"
+
+
+def blocks(language):
+    """The fenced blocks of the README in a language, as lists of lines."""
+    return [block.splitlines() for block in re.findall(rf"^```{language}\n(.*?)^```", README, re.S | re.M)]
+
+
+def shown():
+    """(command, lines that the README shows below it) of all that it has a console do."""
+    steps = []
+    for line in (line for block in blocks("console") for line in block):
+        if line.startswith("$ "):
+            steps.append((line[2:], []))
+        else:
+            steps[-1][1].append(line)
+    return [(command, lines[:-1] if lines and not lines[-1] else lines) for command, lines in steps]
+
+
+def examples():
+    """What the man page's section EXAMPLES has in displays, as a terminal shows it to whoever copies a line."""
+    page = subprocess.run(["groff", "-mdoc", "-Tutf8", "-P-cbou", ROOT / "tool/ktfiles.1"], capture_output=True, text=True, check=True).stdout
+    section = re.search(r"^EXAMPLES\n(.*?)^\S", page, re.S | re.M).group(1)
+    return [line.strip() for line in section.splitlines() if line.startswith(" " * 9)]
+
+
+def without_what_varies(line):
+    """Dates and process ids."""
+    return re.sub(r" +\d{2,7}\b(?=  ktfiles)", " PID", re.sub(r"\b\d{4}-\d\d-\d\dT\d\d:\d\d:\d\dZ", "DATE", line))
+
+
+class DocumentsTest(CommandTest):
+    def setUp(self):
+        super().setUp()
+        shutil.copytree(MEDIA, self.folder, dirs_exist_ok=True)
+        null_device = self.folder.with_suffix(".asound")  # sound goes nowhere, with or without a device
+        null_device.write_text("pcm.!default { type null }\nctl.!default { type null }\n", encoding="utf-8")
+        self.addCleanup(null_device.unlink)
+        self.environment = {**os.environ, "PATH": f"{os.path.dirname(KTFILES)}:{os.environ['PATH']}", "NO_COLOR": "1",
+                            "TERM": "xterm", "LC_ALL": "C.UTF-8", "ALSA_CONFIG_PATH": str(null_device)}
+
+    def typed(self, command, columns=100):
+        """What a terminal shows after a command."""
+        ours, theirs = os.openpty()
+        fcntl.ioctl(theirs, termios.TIOCSWINSZ, struct.pack("HHHH", 40, columns, 0, 0))
+        with subprocess.Popen(["bash", "-c", command], stdin=theirs, stdout=theirs, stderr=theirs, cwd=self.folder,
+                              env=self.environment, start_new_session=True):
+            os.close(theirs)
+            text = b""
+            try:
+                while piece := os.read(ours, 65536):
+                    text += piece
+            except OSError:  # EIO: the other side is gone
+                pass
+        os.close(ours)
+        return text.decode().replace("\r\n", "\n").splitlines()
+
+    @needs_decoders
+    def test_the_readme_shows_what_its_commands_show(self):
+        steps = shown()
+        self.assertGreater(len(steps), 10)
+        for command, expected in steps:
+            pattern = "".join(r"(?:.*\n)*" if line.strip() == OMITTED else re.escape(without_what_varies(line)) + "\n" for line in expected)
+            found = self.typed(command)
+            if not re.fullmatch(pattern, "".join(without_what_varies(line) + "\n" for line in found)):
+                self.fail("\n".join(difflib.unified_diff(expected, found, "README.md: " + command, "now", lineterm="")))
+
+    @needs_decoders
+    def test_what_the_readme_has_for_each_of_its_users_works(self):
+        commands = re.findall(r"^\| \*\*.*\| `(ktfiles [^`]+)` \|$", README, re.M)
+        self.assertEqual(len(commands), 3)
+        for command in commands:
+            self.assert_works(command)
+
+    def test_the_picture_of_the_readme_is_what_is_drawn(self):
+        name = re.search(r"!\[.*\]\((docs/.*\.png)\)", README).group(1)
+        drawing = next(command for command, _ in shown() if "--png" in command)
+        self.typed(drawing)
+        drawn = self.folder / re.search(r"--png (\S+)", drawing).group(1)
+        self.assertTrue(filecmp.cmp(drawn, ROOT / name, shallow=False), f"{name} is not what {drawing!r} draws")
+
+    def test_the_code_in_the_readme_compiles(self):
+        for language, compiler in (("cpp", ["g++", "-std=c++20", "-xc++"]), ("c", ["gcc", "-std=c99", "-pedantic", "-xc"])):
+            for lines in blocks(language):
+                includes = [line for line in lines if line.startswith("#include")]
+                program = "\n".join([*includes, "int main(void) {", *(line for line in lines if line not in includes), "}"])
+                subprocess.run([*compiler, "-fsyntax-only", "-Wall", "-Wextra", "-Werror", "-I", ROOT / "src", "-"],
+                               input=program, text=True, check=True)
+
+    def assert_works(self, command):
+        result = subprocess.run(["bash", "-c", f"set -o pipefail; {command}"], cwd=self.folder, env=self.environment, capture_output=True,
+                                stdin=subprocess.DEVNULL, timeout=60)
+        self.assertEqual(result.returncode, 0, f"{command}: {result.stderr.decode(errors='replace')}")
+        if "jq" in command:  # which is content with a filter that lets nothing through
+            self.assertTrue(result.stdout.strip(), command)
+
+    @needs_decoders
+    def test_examples_of_the_man_page_work_when_they_are_copied(self):
+        synopsis = (ROOT / "tool/ktfiles.1").read_text(encoding="utf-8").split(".Sh DESCRIPTION")[0]
+        commands = examples()[2:]
+        for verb in set(re.findall(r"^\.Cm (.+)$", synopsis, re.M)):
+            self.assertTrue([line for line in commands if f"ktfiles {verb}" in line], f"no example of {verb}")
+        for command in commands:
+            self.assert_works(command)
+
+
+if __name__ == "__main__":
+    unittest.main()

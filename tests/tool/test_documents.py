@@ -1,7 +1,6 @@
 """What README.md and the man page tell people to type, typed: every example works as it stands, and shows what they say."""
 import difflib
 import fcntl
-import filecmp
 import os
 import pathlib
 import re
@@ -12,6 +11,7 @@ import termios
 import unittest
 
 from command import KTFILES, MEDIA, CommandTest, needs_decoders
+from picture import decoded_png
 
 ROOT = pathlib.Path(__file__).resolve().parents[2]
 README = (ROOT / "README.md").read_text(encoding="utf-8")
@@ -94,7 +94,40 @@ class DocumentsTest(CommandTest):
         drawing = next(command for command, _ in shown() if "--png" in command)
         self.typed(drawing)
         drawn = self.folder / re.search(r"--png (\S+)", drawing).group(1)
-        self.assertTrue(filecmp.cmp(drawn, ROOT / name, shallow=False), f"{name} is not what {drawing!r} draws")
+        self.assertTrue(decoded_png(drawn.read_bytes()) == decoded_png((ROOT / name).read_bytes()), f"{drawing} draws another")
+
+    def test_on_a_machine_with_nothing_the_commands_install_or_say_the_line_to_install(self):
+        """A machine of its own: the scripts find no program but these, no package, and what they install they only call."""
+        programs = self.folder / "bin"
+        programs.mkdir()
+        for name in ("bash", "env", "dirname", "grep"):
+            (programs / name).symlink_to(shutil.which(name))
+
+        def stub(name, script):
+            (programs / name).write_text(f"#!{shutil.which('bash')}\n{script}\n", encoding="utf-8")
+            (programs / name).chmod(0o755)
+
+        def complaint(command, status):
+            result = subprocess.run([ROOT / command], env={"PATH": str(programs)}, capture_output=True, text=True)
+            self.assertEqual(result.returncode, status, result.stderr)
+            return result.stderr
+
+        stub("dpkg-query", "exit 1")
+        stub("apt-get", f'echo "$@" >> {self.folder}/called; [ "$1" = update ] || exit 100')
+        for command in ("scripts/run", "scripts/test"):
+            stub("id", "echo 1000")
+            for sudo in (None, "exit 1"):  # there is none; this user may not use it
+                if sudo:
+                    stub("sudo", sudo)
+                self.assertRegex(complaint(command, 1), r"\napt-get update && apt-get install -y .*\bg\+\+ .*\bmake\b.*\n$")
+            self.assertFalse((self.folder / "called").exists())
+            for user, sudo in (("1000", '"$@"'), ("0", "exit 1")):
+                stub("id", f"echo {user}")
+                stub("sudo", sudo)
+                complaint(command, 100)
+                self.assertRegex((self.folder / "called").read_text(), r"^update -qq\ninstall -y .*\bg\+\+ .*\bmake\b")
+                (self.folder / "called").unlink()
+            (programs / "sudo").unlink()
 
     def test_the_code_in_the_readme_compiles(self):
         for language, compiler in (("cpp", ["g++", "-std=c++20", "-xc++"]), ("c", ["gcc", "-std=c99", "-pedantic", "-xc"])):

@@ -2,6 +2,7 @@
 #include "media/containers/AudioDescription.h"
 
 #include "support/ContainerBuilder.h"
+#include "support/MemoryBytes.h"
 
 #include <gtest/gtest.h>
 
@@ -11,29 +12,8 @@ using namespace platform;
 
 namespace {
 
-/// Fails from the read on that goes beyond `readable`.
-class Memory final : public ByteSource {
-public:
-    explicit Memory(Bytes bytes, std::uint64_t readable = UINT64_MAX) : bytes_(std::move(bytes)), readable_(readable) {}
-
-    std::int32_t readSome(std::uint64_t position, void* to, std::size_t count, std::size_t& got) const override
-    {
-        got = 0;
-        if (position + count > readable_)
-            return kStatusIOError;
-        got = std::min<std::size_t>(count, bytes_.size() - std::min<std::uint64_t>(position, bytes_.size()));
-        std::copy_n(bytes_.begin() + static_cast<std::ptrdiff_t>(position), got, static_cast<std::byte*>(to));
-        return kStatusOK;
-    }
-    std::uint64_t length() const { return bytes_.size(); }
-
-private:
-    Bytes bytes_;
-    std::uint64_t readable_;
-};
-
 /// Ids and sizes, then where one more chunk would stand.
-std::string walkOf(const Memory& file, WalkPolicy policy)
+std::string walkOf(const MemoryBytes& file, WalkPolicy policy)
 {
     HeaderWindow window(file, file.length());
     ChunkWalk walk(window, policy);
@@ -92,7 +72,7 @@ TEST(ChunkWalkPolicies, DifferWhereTheySayAndNowhereElse)
         {"too short for a chunk", Bytes(wave.begin(), wave.begin() + 14), "at 12", "begin -50"},
     };
     for (const auto& each : cases) {
-        const Memory file(each.content);
+        const MemoryBytes file(each.content);
         EXPECT_EQ(walkOf(file, WalkPolicy::toTheSound), each.toTheSound) << each.what;
         EXPECT_EQ(walkOf(file, WalkPolicy::asStated), each.asStated.empty() ? each.toTheSound : each.asStated)
             << each.what;
@@ -104,9 +84,9 @@ TEST(ChunkWalkPolicies, AFailedReadIsNoEnd)
     const Bytes content =
         ContainerBuilder("RIFF").format().chunk("data", std::string(9000, 'x')).chunk("note", "abc").bytes();
     for (const WalkPolicy policy : {WalkPolicy::toTheSound, WalkPolicy::asStated}) {
-        const std::string text = walkOf(Memory(content, 9000), policy);
+        const std::string text = walkOf(MemoryBytes(content, 9000), policy);
         EXPECT_NE(text.find("status -36"), std::string::npos) << text;
         EXPECT_EQ(text.find("note"), std::string::npos) << text;
-        EXPECT_EQ(walkOf(Memory(content, 0), policy), "begin -36");
+        EXPECT_EQ(walkOf(MemoryBytes(content, 0), policy), "begin -36");
     }
 }

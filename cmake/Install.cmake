@@ -22,7 +22,7 @@ set(media_headers
     media/samples/SampleConversion.h media/samples/SampleExtremes.h media/samples/SoundFacts.h
     media/samples/StreamDescription.h
     media/containers/AudioHandle.h media/containers/ByteSource.h media/containers/ContainerHeaders.h
-    media/containers/ContainerTraits.h media/containers/HeaderWindow.h
+    media/containers/ContainerCheck.h media/containers/ContainerTraits.h media/containers/HeaderWindow.h
     media/containers/StoredFormat.h
     media/packets/PacketTable.h
     media/decoding/CompressedAudio.h media/decoding/ConvertingReader.h

@@ -1,5 +1,6 @@
-// Containers of any bytes, as a memory file: described, walked, searched and edited. Walks must advance within the
-// file, and no edit may make it longer by more than it adds.
+// Containers of any bytes, as a memory file: described, checked, walked, searched and edited. Walks must advance within
+// the file, and no edit may make it longer by more than it adds.
+#include "audiofile/AudioFileCheck.h"
 #include "audiofile/CAudioFileIO.h"
 
 #include <cstring>
@@ -30,6 +31,11 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
     CAudioFileIO file;
     if (!open(file, data, size))
         return 0;
+    std::vector<platform::ContainerFinding> findings;
+    CheckAudioFile(file, findings);
+    for (const platform::ContainerFinding& finding : findings)
+        require(finding.offset <= size);
+
     FourCC middle = 0;
     std::int64_t position = -1;
     int count = 0;

@@ -31,6 +31,16 @@ class Pair(CommandTest):
                                                  "in/Bass.L.wav     in/Bass.R.wav     pair"])
         self.assertEqual(self.lines("pair", "in", "--quiet"), [])
 
+    def test_suffixes_that_people_write(self):
+        self.write_all("a_L.flac", "a_R.flac", "b-l.wav", "b-r.wav", "c L.aif", "c R.aif", "d (L).wav", "d (R).wav", "e.LEFT.WAV",
+                       "e.RIGHT.wav", "f_Left.wav", "f_Right.wav", "g-Left.wav", "h_l.WAV", "h_R.wav", "_L.wav", "Model.wav",
+                       "i_L.txt", "i_R.txt")
+        self.assertEqual(self.lines("pair", "."), [
+            "./a_L.flac\t./a_R.flac\tpair", "./b-l.wav\t./b-r.wav\tpair", "./c L.aif\t./c R.aif\tpair",
+            "./d (L).wav\t./d (R).wav\tpair", "./e.LEFT.WAV\t./e.RIGHT.wav\tpair", "./f_Left.wav\t./f_Right.wav\tpair",
+            "./g-Left.wav\t./g-Right.wav\tright missing", "./h_l.WAV\t./h_R.wav\tpair"])
+        self.assertEqual(self.lines("pair", "f_Right.wav"), ["f_Left.wav\tf_Right.wav\tpair"])
+
     def test_files_that_are_named(self):
         self.write_all("a.L.wav", "a.R.wav", "mono.wav", "b.L.wav")
         os.mkdir(self.folder / "b.R.wav")  # no partner

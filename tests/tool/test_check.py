@@ -1,0 +1,99 @@
+"""ktfiles info --check, --md5 and --sha256: what is off in files, and digests of their sound."""
+import hashlib
+import struct
+import subprocess
+import unittest
+
+from command import KTFILES, CommandTest, caf, chunk, needs_decoders, wave
+
+
+class Check(CommandTest):
+    def make(self, *commands):
+        for command in commands:
+            subprocess.run(command, shell=True, check=True, cwd=self.folder, stdout=subprocess.DEVNULL,
+                           stderr=subprocess.DEVNULL, stdin=subprocess.DEVNULL)
+
+    @needs_decoders
+    def test_is_silent_about_what_encoders_write(self):
+        # Odd numbers of bytes, too; of AIFF in 24 bits some leave out the last pad byte, and are told.
+        self.make("sox -n -r 44100 -b 16 -c 2 a.wav synth 4411s sine 300", "sox -n -r 44100 -b 8 -c 1 b.wav synth 441s sine 300",
+                  "sox -n -r 48000 -b 24 -c 1 c.wav synth 444s sine 300")
+        for name in "abc":
+            self.make(*(f"sox {name}.wav {name}.sox.{kind}" for kind in ("aiff", "aifc", "au", "caf", "w64")),
+                      *(f"ffmpeg -i {name}.wav {name}.ff.{kind}" for kind in ("wav", "aiff", "au", "caf", "w64")),
+                      *(f"sndfile-convert {name}.wav {name}.sf.{kind}" for kind in ("wav", "aiff", "aifc", "au", "caf", "w64")),
+                      f"ffmpeg -i {name}.wav -rf64 always {name}.rf64.wav", f"ffmpeg -i {name}.wav -c:a adpcm_ms {name}.ms.wav",
+                      f"ffmpeg -i {name}.wav -c:a adpcm_ima_wav {name}.ima.wav", f"sox {name}.wav -e float {name}.float.wav",
+                      f"sox {name}.wav -e u-law {name}.ulaw.wav", f"sox {name}.wav -e gsm {name}.gsm.wav",
+                      f"flac {name}.wav -o {name}.flac", f"flac -d {name}.flac -o {name}.flacd.wav",
+                      f"flac -d --force-aiff-format {name}.flac -o {name}.flacd.aiff",
+                      f"flac -d --force-wave64-format {name}.flac -o {name}.flacd.w64",
+                      f"wavpack {name}.wav -o {name}.wv", f"wvunpack {name}.wv -o {name}.wvd.wav",
+                      f"wvunpack --caf-be {name}.wv -o {name}.wvd.caf", f"oggenc {name}.wav -o {name}.ogg",
+                      f"oggdec {name}.ogg -o {name}.oggd.wav", f"opusenc {name}.wav {name}.opus",
+                      f"opusdec {name}.opus {name}.opusd.wav", f"lame {name}.wav {name}.mp3",
+                      f"lame --decode {name}.mp3 {name}.lamed.wav", f"mpg123 -w {name}.mpg.wav {name}.mp3",
+                      f"{KTFILES} decode {name}.ogg -o {name}.own.wav", f"{KTFILES} decode {name}.ogg -o {name}.own.caf")
+        (self.folder / "c.sox.aiff").unlink()
+        (self.folder / "c.sox.aifc").unlink()
+        files = sorted(path.name for path in self.folder.iterdir())
+        self.assertGreater(len(files), 90)
+        result = self.run_command("info", "--check", *files)
+        self.assertEqual((result.stdout, result.stderr), (b"", b""))
+
+    def test_tells_what_is_off_and_where(self):
+        good = wave(chunk(b"note", b"odd"))
+        self.write("good.wav", good)
+        self.write("cut.wav", good[:-100])
+        self.write("fact.caf", caf((b"info", b"\0\0\0\0"), (b"info", b"\0\0\0\0")))
+        result = self.run_command("info", "--check", "good.wav", "cut.wav", "fact.caf", status=1)
+        self.assertEqual(result.stdout.decode().splitlines(), [
+            f"cut.wav: 0: RIFF says that it ends at {len(good)}, the file ends at {len(good) - 100}; readers take what is there",
+            f"cut.wav: 36: data says 200 bytes, {len(good) - 144} are there; readers take what is there, or refuse the file",
+            "fact.caf: 68: info stands here again, first at 52; readers take one of them"])
+        self.assertEqual(result.stderr, b"")
+        records = self.json("info", "--check", "good.wav", "cut.wav", status=1)
+        self.assertEqual([record["path"] for record in records], ["good.wav", "cut.wav"])
+        self.assertEqual(records[0]["findings"], [])
+        self.assertEqual([finding["kind"] for finding in records[1]["findings"]], ["containerIsCut", "chunkIsCut"])
+        self.assertEqual(records[1]["findings"][1]["offset"], 36)
+        self.assertEqual(records[1]["findings"][1]["chunk"], "data")
+        # What cannot be read at all is an error as ever.
+        self.write("none.wav", b"")
+        self.assertEqual(self.failure("info", "--check", "none.wav"), "ktfiles: none.wav: is empty\n")
+
+    @needs_decoders
+    def test_compressed_files_that_lack_some(self):
+        path = self.encoded("a.flac", seconds=3)
+        self.assertEqual(self.lines("info", "--check", "a.flac"), [])
+        path.write_bytes(path.read_bytes()[:-20000])
+        (line,) = self.lines("info", "--check", "a.flac", status=1)
+        self.assertRegex(line, r"^a.flac: promises 132300 frames, \d+ are there; readers take what is there$")
+
+
+class Digests(CommandTest):
+    def test_are_of_the_samples_alone(self):
+        samples = bytes(range(200))
+        self.write("a.wav", wave(chunk(b"bext", bytes(602))))
+        sound = wave()[44:]
+        rows = self.lines("info", "--md5", "--sha256", "a.wav")
+        self.assertEqual(rows[0].split("\t")[-2:], [hashlib.md5(sound).hexdigest(), hashlib.sha256(sound).hexdigest()])
+        self.write("a.caf", caf(samples=samples))
+        self.assertEqual(self.json("info", "--md5", "a.caf")[0]["md5"], hashlib.md5(samples).hexdigest())
+
+    @needs_decoders
+    def test_agree_with_flac(self):
+        self.encoded("a.wav", "-c:a", "pcm_s16le")
+        subprocess.run(["flac", "-s", "a.wav"], check=True, cwd=self.folder)
+        stated = subprocess.run(["metaflac", "--show-md5sum", "a.flac"], check=True, cwd=self.folder, capture_output=True,
+                                text=True).stdout.strip()
+        records = self.json("info", "--md5", "a.wav", "a.flac")
+        self.assertEqual([record["md5"] for record in records], [stated, stated])
+        # Of an MP3 nobody keeps one; SHA-256 is not FLAC's.
+        self.encoded("a.mp3")
+        records = self.json("info", "--md5", "--sha256", "a.mp3", "a.flac")
+        self.assertEqual([("md5" in record, "sha256" in record) for record in records], [(False, False), (True, False)])
+
+
+if __name__ == "__main__":
+    unittest.main()

@@ -377,4 +377,5 @@ INSTANTIATE_TEST_SUITE_P(
                                             {"opus", "opusenc IN OUT"},
                                             {"flac", "flac -8 IN -o OUT"},
                                             {"ogg", "flac --ogg IN -o OUT"},
+                                            {"mpc", "mpcenc IN OUT"},
                                             {"wv", "wavpack -h IN -o OUT"}}));

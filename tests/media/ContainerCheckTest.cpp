@@ -2,6 +2,7 @@
 #include "media/containers/ContainerCheck.h"
 
 #include "media/AudioContainers.h"
+#include "support/Hex.h"
 #include "support/MemoryBytes.h"
 
 #include <random>
@@ -144,6 +145,9 @@ TEST(ContainerCheck, NoBytesLeadAstray)
 {
     EXPECT_TRUE(findingsOf({}, kStatusParameterError).empty());
     EXPECT_TRUE(findingsOf(Bytes(100), kStatusParameterError).empty());
+    // Where nothing is known of the sound, a chunk without a name is not its format.
+    const Bytes rex2 = fromHex("43415420 0000001E 52455832 48454144 00000006 000000000000 00000000 00000003 00000000");
+    EXPECT_TRUE(findingsOf(rex2).empty());
     std::mt19937 random(7);
     for (FourCC container : {kWAVEFile, kRF64File, kAIFFFile, kCAFFile}) {
         const Bytes whole = buildContainer(container, chunksOf(container, {{fourCC("note"), "odd"}}));

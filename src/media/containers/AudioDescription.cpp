@@ -42,6 +42,8 @@ bool AudioDescriber::isLikeWAVE() const
 void AudioDescriber::meet(const WalkedChunk& chunk)
 {
     const ContainerTraits& traits = *container_.traits;
+    if (traits.readFormat == nullptr) // of its sound nothing is known
+        return;
     if (chunk.id == traits.formatId && !metFormat_)
         readFormat(chunk);
     else if (chunk.id == traits.soundId && !found_.hasSound)

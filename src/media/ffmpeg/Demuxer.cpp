@@ -4,6 +4,7 @@
 #include "media/ffmpeg/CodingNames.h"
 #include "platform/core/Status.h"
 
+#include <algorithm>
 #include <cstddef>
 #include <new>
 #include <vector>
@@ -166,6 +167,20 @@ bool Demuxer::read(AVPacket& packet, std::int32_t& status)
 bool Demuxer::seek(std::int64_t time)
 {
     return av_seek_frame(context_.get(), stream_, time, AVSEEK_FLAG_BACKWARD) >= 0;
+}
+
+std::size_t Demuxer::readAt(std::uint64_t position, std::byte* to, std::size_t count)
+{
+    AVIOContext* const file = context_->pb;
+    if (file == nullptr)
+        return 0;
+    const std::int64_t before = avio_tell(file);
+    int got = 0;
+    if (position <= INT64_MAX && avio_seek(file, static_cast<std::int64_t>(position), SEEK_SET) >= 0)
+        got =
+            avio_read(file, reinterpret_cast<unsigned char*>(to), static_cast<int>(std::min<std::size_t>(count, 4096)));
+    avio_seek(file, before, SEEK_SET);
+    return static_cast<std::size_t>(std::max(got, 0));
 }
 
 std::uint64_t Demuxer::size() const

@@ -3,6 +3,7 @@
 
 #include "media/ffmpeg/Handles.h"
 
+#include <cstddef>
 #include <cstdint>
 #include <string>
 #include <string_view>
@@ -29,6 +30,8 @@ public:
     bool read(AVPacket& packet, std::int32_t& status);
     /// To a packet at or before a time, in the stream's units, as well as the file lets it be found.
     bool seek(std::int64_t time);
+    /// Bytes of the file itself, up to `count`, and their number; the packets go on where they were.
+    std::size_t readAt(std::uint64_t position, std::byte* to, std::size_t count);
     /// The file's length in bytes; 0 when it cannot be told.
     std::uint64_t size() const;
     /// To the first packet, in the state of a newly opened file.

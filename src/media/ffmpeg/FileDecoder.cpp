@@ -84,6 +84,7 @@ std::unique_ptr<FileDecoder> FileDecoder::open(const char* path, std::int32_t& s
         return nullptr;
     std::unique_ptr<CorrectionFile> corrections = CorrectionFile::beside(path, demuxer);
     std::unique_ptr<FileDecoder> decoder(new FileDecoder(std::move(demuxer), std::move(corrections)));
+    decoder->musepack_ = readMusepackInfo(decoder->demuxer_);
     status = decoder->begin();
     if (status == kStatusOK)
         status = decoder->describeAsDecoded();
@@ -159,9 +160,12 @@ std::int32_t FileDecoder::describeAsDecoded()
     if (status = countFrames(isAnew ? 0 : span.end, count); status != kStatusOK)
         return status;
     limit_ = count;
+    const std::uint64_t lead = musepack_ ? musepack_->lead : 0;
+    if (musepack_)
+        count = std::min(count - std::min(count, lead), musepack_->frames);
     facts.promisedFrames = promisedFrames(count, frames->sampleRate);
     note(facts);
-    describe(fileType, file, *frames, 0, count, DecodedFileHandle::unknownCount);
+    describe(fileType, file, *frames, lead, count, DecodedFileHandle::unknownCount);
     if (stated)
         noteChecksum(*stated, file.bitsPerChannel);
     forget(); // whoever reads starts anew; whoever only asks does not pay for it
@@ -210,6 +214,8 @@ std::int32_t FileDecoder::countFrames(std::uint64_t first, std::uint64_t& count)
 /// counts what primes a decoder.
 std::uint64_t FileDecoder::promisedFrames(std::uint64_t count, double sampleRate) const
 {
+    if (musepack_)
+        return musepack_->frames > count ? musepack_->frames : 0;
     constexpr std::array<std::string_view, 5> exact{"flac", "tta", "wv", "ape", "tak"};
     constexpr std::array<std::string_view, 5> inexact{"mpc", "mpc8", "dsf", "iff", "mov,mp4,m4a,3gp,3g2,mj2"};
     const AVStream& stream = demuxer_.stream();

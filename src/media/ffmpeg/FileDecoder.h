@@ -5,6 +5,7 @@
 #include "media/ffmpeg/Codec.h"
 #include "media/ffmpeg/CorrectionFile.h"
 #include "media/ffmpeg/Demuxer.h"
+#include "media/ffmpeg/MusepackInfo.h"
 #include "media/ffmpeg/SpanDecoder.h"
 
 #include <memory>
@@ -53,6 +54,7 @@ private:
 
     Demuxer demuxer_;
     std::unique_ptr<CorrectionFile> corrections_; // null when there are none
+    std::optional<MusepackInfo> musepack_;        // of such files, where the header says it
     std::unique_ptr<Codec> codec_;
     Packet packet_;
     std::uint64_t sent_ = 0; // packets since the start

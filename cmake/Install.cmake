@@ -50,6 +50,8 @@ file(RELATIVE_PATH library_from_command ${CMAKE_INSTALL_FULL_BINDIR} ${CMAKE_INS
 set_target_properties(ktfiles PROPERTIES INSTALL_RPATH "$ORIGIN/${library_from_command}")
 install(TARGETS ktfiles RUNTIME DESTINATION ${CMAKE_INSTALL_BINDIR} COMPONENT command)
 install(FILES tool/ktfiles.1 DESTINATION ${CMAKE_INSTALL_MANDIR}/man1 COMPONENT command)
+file(GLOB schemas CONFIGURE_DEPENDS ${PROJECT_SOURCE_DIR}/docs/schemas/*.json)
+install(FILES ${schemas} DESTINATION ${CMAKE_INSTALL_DATADIR}/ktfiles/schemas COMPONENT command)
 install(FILES tool/ktfiles.bash DESTINATION ${CMAKE_INSTALL_DATADIR}/bash-completion/completions RENAME ktfiles
     COMPONENT command)
 # The files that the examples of the man page name.

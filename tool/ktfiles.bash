@@ -5,7 +5,8 @@ _ktfiles()
     local cur prev words cword
     _init_completion || return
 
-    local common='--json --quiet --color --coordination --help' edit='--in-place --dry-run --backup --keep-times --timeout'
+    local common='--json --jsonl --quiet --color --coordination --help' edit='--in-place --dry-run --backup --keep-times --timeout'
+    local files='--files-from --null'
     local keys='beatCount midiRootNote keyType signatureTop signatureBottom loopFileType instrumentType
         instrumentSubType genre descriptors title artist copyright comments transients key mode signature'
     local projects='media dirs backup restore settle rename-alternative'
@@ -30,7 +31,7 @@ _ktfiles()
     case $prev in
         --color) COMPREPLY=($(compgen -W 'auto always never' -- "$cur")); return ;;
         --coordination | --with) _filedir -d; return ;;
-        --from | -o | --output | --png | --svg) _filedir; return ;;
+        --files-from | --from | -o | --output | --png | --svg) _filedir; return ;;
         --sidecar) return ;;
         --colors) COMPREPLY=($(compgen -W 'night day amber rose ink' -- "$cur")); return ;;
         --width | --height | --start | --end | --alternative | --keep | --timeout) return ;;
@@ -50,18 +51,19 @@ _ktfiles()
         fi
     elif [[ $cur == -* ]]; then
         case $verb/$object in
-            info/*) COMPREPLY=($(compgen -W "--long $common" -- "$cur")) ;;
+            info/*) COMPREPLY=($(compgen -W "--long $files $common" -- "$cur")) ;;
             chunks/get) COMPREPLY=($(compgen -W "--output --force --sidecar $common" -- "$cur")) ;;
             chunks/add) COMPREPLY=($(compgen -W "--from --replace --sidecar --force $edit $common" -- "$cur")) ;;
             chunks/remove) COMPREPLY=($(compgen -W "--sidecar --force $edit $common" -- "$cur")) ;;
-            adm/*) COMPREPLY=($(compgen -W "--long --lenient --check $common" -- "$cur")) ;;
-            tags/set | tags/remove | tags/copy) COMPREPLY=($(compgen -W "$edit $common" -- "$cur")) ;;
+            adm/*) COMPREPLY=($(compgen -W "--long --lenient --check $files $common" -- "$cur")) ;;
+            tags/set | tags/remove | tags/copy) COMPREPLY=($(compgen -W "$files $edit $common" -- "$cur")) ;;
             overview/*) COMPREPLY=($(compgen -W "--png --svg --width --height --start --end --frames --scale --colors
-                --force --stored --store $edit $common" -- "$cur")) ;;
+                --force --stored --store $files $edit $common" -- "$cur")) ;;
             decode/*) COMPREPLY=($(compgen -W "--output --format --rate --channels --bits --start --end --frames --conceal
-                --force $common" -- "$cur")) ;;
+                --force $files $common" -- "$cur")) ;;
             lock/*) COMPREPLY=($(compgen -W "--read --write --presenter --timeout -- $common" -- "$cur")) ;;
-            scan/*) COMPREPLY=($(compgen -W "--csv --threads $common" -- "$cur")) ;;
+            scan/*) COMPREPLY=($(compgen -W "--csv --threads $files $common" -- "$cur")) ;;
+            chunks/* | tags/* | pair/*) COMPREPLY=($(compgen -W "$files $common" -- "$cur")) ;;
             project/media) COMPREPLY=($(compgen -W "--missing --alternative $common" -- "$cur")) ;;
             project/dirs) COMPREPLY=($(compgen -W "--create --alternative --timeout $common" -- "$cur")) ;;
             project/backup) COMPREPLY=($(compgen -W "--keep --alternative --dry-run --timeout $common" -- "$cur")) ;;

@@ -11,6 +11,8 @@ import subprocess
 import tempfile
 import unittest
 
+import schemas
+
 KTFILES = os.environ["KTFILES"]
 # Nothing of the tests shows in the user's own folder, and runs side by side do not wait for each other.
 os.environ["KTFILES_COORDINATION"] = tempfile.mkdtemp(prefix="ktfiles-coordination-")
@@ -62,6 +64,8 @@ class CommandTest(unittest.TestCase):
         result = subprocess.run([KTFILES, *arguments], input=stdin, capture_output=True, cwd=self.folder, timeout=60,
                                 **options)
         self.assertEqual(result.returncode, status, (arguments, result.stdout, result.stderr))
+        if (shape := schemas.shape_of(arguments)) and result.stdout:
+            schemas.check(arguments, result.stdout, shape)
         return result
 
     def without_decoders(self):
@@ -83,6 +87,11 @@ class CommandTest(unittest.TestCase):
 
     def json(self, *arguments, **options):
         return json.loads(self.run_command(arguments[0], "--json", *arguments[1:], **options).stdout)
+
+    def record(self, *arguments, **options):
+        """Of JSON that is to tell of one file."""
+        one, = self.json(*arguments, **options)
+        return one
 
     def failure(self, *arguments, status=1, **options):
         """The one line on standard error of a run that fails."""

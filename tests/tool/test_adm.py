@@ -84,7 +84,7 @@ class Source(CommandTest):
             self.write(name, content)
             with self.subTest(name):
                 self.assertEqual(self.failure("adm", name), f"ktfiles: {name}: {error}\n")
-                self.assertEqual(self.json("adm", name, status=1), {"path": name, "error": error})
+                self.assertEqual(self.record("adm", name, status=1), {"path": name, "error": error})
 
 
 class Tree(CommandTest):
@@ -159,9 +159,9 @@ o1002  AO_1002  object
         self.assertEqual([line.split("\t")[4] for line in self.lines("adm", "a.xml")], [
             "gain ∞, importance -1, moved ∞ left", "Objects, importance -1", "Objects, 1 block",
             "throughout, ∞° left, gain -∞ dB"])
-        given = self.json("adm", "a.xml")
+        given = self.record("adm", "a.xml")
         self.assertEqual([given[key][0]["importance"] for key in ("objects", "packFormats")], [-1, -1])
-        self.assertIsNone(given["objects"][0]["gain"])
+        self.assertNotIn("gain", given["objects"][0])
 
     def test_circles_and_many_ways(self):
         self.write("circle.xml", document(audio_object("AO_1001", reference("audioObject", "AO_1002", "AO_1001")),
@@ -189,7 +189,7 @@ o1002  AO_1002  object
 class Json(CommandTest):
     def test_agrees_with_another_reader(self):
         self.write("t.xml", (MEDIA / "harbour.xml").read_bytes())
-        given = self.json("adm", "t.xml")
+        given = self.record("adm", "t.xml")
         root = ElementTree.parse(MEDIA / "harbour.xml").getroot()
         space = "{urn:ebu:metadata-schema:ebuCore_2016}"
         for key, name in (("programmes", "audioProgramme"), ("contents", "audioContent"), ("objects", "audioObject"),
@@ -225,33 +225,31 @@ class Json(CommandTest):
             named("audioProgramme", "APR_100F", "p", more='start=""'), named("audioContent", "ACO_1001", "c"),
             '<audioTrackUID UID="atu_0000000a"/>',
             channel(block(1, FRONT, '<jumpPosition>y</jumpPosition>', times='rtime="00:00:01.5"'), block(2, FRONT))))
-        given = self.json("adm", "a.xml")
+        given = self.record("adm", "a.xml")
         self.assertEqual(given["programmes"], [{
-            "audioProgrammeID": "APR_100F", "index": 0x100F, "audioProgrammeName": "p", "audioProgrammeLanguage": None,
-            "start": 0, "end": None, "maxDuckingDepth": 0, "audioContentIDs": [], "audioProgrammeLabels": {}}])
+            "audioProgrammeID": "APR_100F", "index": 0x100F, "audioProgrammeName": "p", "start": 0, "maxDuckingDepth": 0, "audioContentIDs": [], "audioProgrammeLabels": {}}])
         self.assertEqual(given["contents"], [{
-            "audioContentID": "ACO_1001", "index": 0x1001, "audioContentName": "c", "audioContentLanguage": None,
+            "audioContentID": "ACO_1001", "index": 0x1001, "audioContentName": "c",
             "audioObjectIDRefs": [], "audioContentLabels": {}, "dialogueMode": 2, "nonDialogueContentKind": 0,
             "dialogueContentKind": 0, "mixedContentKind": 0}])
         self.assertEqual(given["trackUIDs"], [{
-            "audioTrackUIDID": "atu_0000000a", "index": 10, "sampleRate": 0, "bitDepth": 0, "audioTrackFormatIDRef": None,
-            "audioChannelFormatIDRef": None, "audioPackFormatIDRef": None}])
+            "audioTrackUIDID": "atu_0000000a", "index": 10}])
         self.assertEqual(given["objects"], [{
-            "audioObjectID": "AO_1001", "audioObjectName": "o1001", "start": 0, "duration": None, "dialogueMode": 2,
+            "audioObjectID": "AO_1001", "audioObjectName": "o1001", "start": 0, "dialogueMode": 2,
             "importance": 10, "interact": False, "disallowDucking": False, "audioPackFormatIDRefs": [],
             "audioObjectIDRefs": [], "audioTrackUIDRefs": [], "audioObjectLabels": {'d"e': 'Ü"\\'},
-            "gain": None, "gainUnit": 1, "headLocked": False, "mute": False,
+            "gainUnit": 1, "headLocked": False, "mute": False,
             "polarOffset": {"azimuth": 0, "elevation": 0, "distance": 0}, "cartesianOffset": {"X": 0, "Y": 0.1, "Z": 0}}])
         self.assertEqual(given["channelFormats"][0]["audioBlockFormat"][0], {
             "audioBlockFormatID": "AB_00031001_00000001", "type": 3, "index": 0x1001, "blockIndex": 1, "rtime": 1000050,
-            "duration": None, "hasGain": False, "gain": 1, "gainUnit": 0, "importance": 1, "headLocked": False,
+            "hasGain": False, "gain": 1, "gainUnit": 0, "importance": 1, "headLocked": False,
             "headphoneVirtualize": False,
             "position": {"cartesian": False, "X": 0, "Y": 0, "Z": 0, "azimuth": 0, "elevation": 0, "distance": 1},
             "hasCartesianX": False, "hasCartesianY": False, "hasCartesianZ": False, "hasPolarAzimuth": True,
             "hasPolarElevation": True, "hasPolarDistance": False, "width": 0, "height": 0, "depth": 0, "hasWidth": False,
             "hasHeight": False, "hasDepth": False, "diffuse": 0, "jumpPosition": True, "interpolationLength": -1,
             "screenRef": False})
-        exact = self.json("adm", "a.xml", "--lenient")
+        exact = self.record("adm", "a.xml", "--lenient")
         self.assertEqual(exact["channelFormats"][0]["audioBlockFormat"][0]["rtime"], 1500000)
         self.assertEqual(exact["diagnostics"], [])
 
@@ -279,7 +277,7 @@ class Problems(CommandTest):
         self.assertIn("1\tmissing\tAO_9999\t\t", lines)
         self.assertIn("1\tsilent track\tATU_00000000\t\t", lines)
         self.assertEqual(sum("\tblock\t" in line for line in lines), 2)
-        diagnostics = self.json("adm", "--lenient", "bad.xml")["diagnostics"]
+        diagnostics = self.record("adm", "--lenient", "bad.xml")["diagnostics"]
         self.assertEqual([(d["line"], d["elementID"]) for d in diagnostics],
                          [(6, "AB_00021001_00000002"), (3, "ACO_1001")])
         # What has no opt-in stays an error.
@@ -373,7 +371,7 @@ class Check(CommandTest):
     def test_messages_stay_on_one_line(self):
         self.write("a.xml", b"<a>\xff</a>")
         self.assertNotIn("\\x0A", self.failure("adm", "a.xml"))
-        self.assertNotIn("\n", self.json("adm", "--check", "a.xml", status=1)["problems"][0]["reason"])
+        self.assertNotIn("\n", self.record("adm", "--check", "a.xml", status=1)["problems"][0]["reason"])
 
 
 class Large(CommandTest):
@@ -389,7 +387,7 @@ class Large(CommandTest):
         self.assertIn(f"AO_1002\t{long[:100]}…\tsee above", text)
         self.assertLess(len(text), 2_000_000)
         self.write("id.xml", document(audio_object("AO_" + long, reference("audioObject", *["AO_1"] * 3000))))
-        problems = self.json("adm", "--check", "id.xml", status=1)["problems"]
+        problems = self.record("adm", "--check", "id.xml", status=1)["problems"]
         self.assertEqual({len(problem["elementID"]) for problem in problems}, {102})
 
     def test_memory_is_that_of_the_document(self):

@@ -20,10 +20,11 @@ class List(CommandTest):
                       [("desc", 8, 32), ("info", 52, 4), ("data", 68, 204)]),
         }
         for name, (content, container, end, chunks) in cases.items():
+            word = {"FORM": "AIFF", "caff": "CAF", "RIFF": "WAVE"}.get(container, container)
             self.write(name, content)
             with self.subTest(name):
-                self.assertEqual(self.json("chunks", name), {
-                    "path": name, "container": container, "containerEnd": end,
+                self.assertEqual(self.record("chunks", name), {
+                    "path": name, "container": container, "containerName": word, "containerEnd": end, "fileLength": len(content),
                     "chunks": [dict(zip(("id", "offset", "size"), item)) for item in chunks]})
                 self.assertEqual(self.lines("chunks", name), ["\t".join(map(str, item)) for item in chunks])
         self.assertEqual(self.lines("chunks", "b.wav", "c.aiff")[0], "b.wav\tds64\t12\t28")
@@ -71,7 +72,7 @@ class List(CommandTest):
                 ("a.wav", "RIFX", ["fmt \t12\t16", "note\t36\t3", "data\t48\t20"])):
             with self.subTest(name):
                 self.assertEqual(self.lines("chunks", name), listing)
-                self.assertEqual(self.json("chunks", name)["container"], container)
+                self.assertEqual(self.record("chunks", name)["container"], container)
                 self.assertEqual(self.run_command("chunks", "get", name, "note").stdout, b"abc")
                 for arguments in (["add", name, "note", "--from", name], ["remove", name, "note"]):
                     self.assertIn("only read", self.failure("chunks", *arguments))
@@ -115,7 +116,7 @@ class Get(CommandTest):
         self.assertIn("b.wav exists; --force replaces it", self.failure("chunks", "get", "a.wav", "note", "-o", "b.wav"))
         self.assertEqual(recording.read_bytes(), wave(frames=9))
         recording.unlink()
-        self.assertEqual(self.json("chunks", "get", "a.wav", "note", "-o", "/dev/null"),
+        self.assertEqual(self.record("chunks", "get", "a.wav", "note", "-o", "/dev/null"),
                          {"path": "a.wav", "id": "note", "offset": 244, "size": 4})
         self.assertIn("over the file itself", self.failure("chunks", "get", "a.wav", "note", "-o", "a.wav"))
         self.assertIn("is a folder", self.failure("chunks", "get", "a.wav", "note", "-o", "."))

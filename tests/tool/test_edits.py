@@ -82,7 +82,7 @@ class Edits(CommandTest):
         self.add("uncounted", "note", "--force")
         self.assertEqual((self.folder / "uncounted").read_bytes()[244:256], chunk(b"note", b"text"))
         self.run_command("chunks", "remove", "sound", "data", "--force")
-        self.assertEqual([item["id"] for item in self.json("chunks", "sound")["chunks"]], ["fmt ", "free"])
+        self.assertEqual([item["id"] for item in self.record("chunks", "sound")["chunks"]], ["fmt ", "free"])
 
     def test_no_objection_to_what_is_merely_odd(self):
         # Sizes that writers into a pipe leave behind, and a data chunk without its pad byte.
@@ -91,7 +91,7 @@ class Edits(CommandTest):
         for content in (streamed, unpadded):
             path = self.write("a.wav", content)
             self.add("a.wav", "note")
-            self.assertEqual([item["id"] for item in self.json("chunks", "a.wav")["chunks"]], ["fmt ", "data", "note"])
+            self.assertEqual([item["id"] for item in self.record("chunks", "a.wav")["chunks"]], ["fmt ", "data", "note"])
             self.assertEqual(path.read_bytes()[44:243], wave()[44:243])
 
     def test_stray_bytes_that_are_no_chunk_are_no_obstacle(self):
@@ -146,7 +146,7 @@ class Edits(CommandTest):
         os.link(path, self.folder / "a.wav.bak")  # what is there between the backup and the rename
         self.assertIn("a.wav.bak is the same file still", self.failure("chunks", "add", "a.wav", "note", "--in-place"))
         self.assertEqual(path.read_bytes(), wave())
-        self.assertTrue(self.json("chunks", "add", "a.wav", "note", "--backup")["backup"].endswith("a.wav.bak"))
+        self.assertTrue(self.record("chunks", "add", "a.wav", "note", "--backup")["backup"].endswith("a.wav.bak"))
         self.assertEqual((self.folder / "a.wav.bak").read_bytes(), wave())
         self.assertEqual(path.read_bytes(), wave(chunk(b"note", b"")))
         self.assert_no_litter("a.wav", "a.wav.bak")
@@ -193,7 +193,7 @@ class Edits(CommandTest):
             expected = []
             for number in ("", ".1", ".2"):
                 expected.append((f"a.wav.bak{number}", path.read_bytes()))
-                report = self.json("chunks", "add", "a.wav", "note", "--backup", *options, stdin=b"x")
+                report = self.record("chunks", "add", "a.wav", "note", "--backup", *options, stdin=b"x")
                 self.assertTrue(report["backup"].endswith(expected[-1][0]))
             for name, content in expected:
                 self.assertEqual((self.folder / name).read_bytes(), content)
@@ -243,7 +243,7 @@ class Interruptions(CommandTest):
         edits = [subprocess.Popen([KTFILES, "chunks", "add", "a.wav", f"n{i:03}", "-q"], stdin=subprocess.DEVNULL,
                                   cwd=self.folder) for i in range(12)]
         self.assertEqual([edit.wait(60) for edit in edits], [0] * 12)
-        ids = [item["id"] for item in self.json("chunks", "a.wav")["chunks"]]
+        ids = [item["id"] for item in self.record("chunks", "a.wav")["chunks"]]
         self.assertEqual(sorted(ids[4:]), [f"n{i:03}" for i in range(12)])
         self.assert_no_litter("a.wav")
 

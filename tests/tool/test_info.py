@@ -24,7 +24,7 @@ class Info(CommandTest):
             with self.subTest(item["path"]):
                 channels, rate, frames = map(int, match.groups())
                 self.assertEqual((item["channels"], item["sampleRate"]), (channels, rate))
-                if item["bitsPerSample"] > 4:  # the count of a compressed file's frames is a matter of padding
+                if item.get("bitsPerSample", 0) > 4:  # the count of a compressed file's frames is a matter of padding
                     self.assertEqual(item["frames"], frames)
                     self.assertAlmostEqual(item["durationSeconds"], frames / rate)
                 self.assertEqual(item["fileLength"], os.path.getsize(item["path"]))
@@ -39,8 +39,8 @@ class Info(CommandTest):
                 path = self.encoded(name, *(("-c:a", "flac") if name == "a.ogg" else ()))
                 self.assertEqual(self.lines("info", path), ["\t".join([str(path), *row])])
                 item = self.json("info", path)[0]
-                self.assertEqual([item[key] for key in ("frames", "bitsPerSample", "fileLength")],
-                                 [44100, 0, path.stat().st_size])
+                self.assertEqual((item["frames"], item["fileLength"]), (44100, path.stat().st_size))
+                self.assertFalse({"bitsPerSample", "floatingPoint", "dataOffset"} & set(item))
         # AAC in LOAS, and WAVE behind a tag of MP3.
         item = self.json("info", self.encoded("a.latm", "-c:a", "aac", "-f", "latm"))[0]
         self.assertEqual((item["coding"], item["sampleRate"]), ("AAC-LC", 44100))
@@ -186,11 +186,10 @@ class Info(CommandTest):
         good = wave()
         self.write("good.wav", good)
         self.write("empty.wav", b"")
-        os.mkdir(self.folder / "folder.wav")
         os.mkfifo(self.folder / "fifo.wav")  # would block whoever opens it
         for length in range(1, 20):
             self.write(f"cut{length}.wav", good[:length])
-        bad = ["empty.wav", "folder.wav", "fifo.wav", "/dev/zero", "missing.wav", "good.wav/",
+        bad = ["empty.wav", "fifo.wav", "/dev/zero", "missing.wav", "good.wav/",
                *(f"cut{length}.wav" for length in range(1, 20))]
         result = self.run_command("info", *bad, "good.wav", "--json", status=1)
         items = json.loads(result.stdout)
@@ -198,8 +197,8 @@ class Info(CommandTest):
         self.assertEqual(items[-1]["frames"], 100)
         errors = result.stderr.decode().splitlines()
         self.assertEqual(errors, [f"ktfiles: {item['path']}: {item['error']}" for item in items[:-1]])
-        self.assertEqual([item["error"] for item in items[:6]],
-                         ["is empty", "is a folder", "is a FIFO, not a regular file", "is a device, not a regular file",
+        self.assertEqual([item["error"] for item in items[:5]],
+                         ["is empty", "is a FIFO, not a regular file", "is a device, not a regular file",
                           "file not found", "not a folder"])
 
     def test_names(self):

@@ -38,7 +38,7 @@ class Picture(CommandTest):
         size = ("--width", str(width), "--height", str(height))
         png = self.run_command("overview", "a.wav", "--png", "-", *size, *PICTURE, *options).stdout
         self.svg = self.run_command("overview", "a.wav", "--svg", "-", *size, *options).stdout
-        return self.json("overview", "a.wav")["points"], WhiteOnBlack(png)
+        return self.record("overview", "a.wav")["points"], WhiteOnBlack(png)
 
     @staticmethod
     def edges(low, high, height):
@@ -124,8 +124,9 @@ class Output(CommandTest):
         self.write("a.wav", pcm([0] * 256 + [32767] * 256 + [-16384, 8192]))
         self.write("b&<é.wav", pcm([0] * 100))
         self.write("bad.wav", b"RIFF")
-        one = {"path": "a.wav", "frames": 514, "framesPerPoint": 256, "points": [[0, 0], [0, 127], [-64, 32]]}
-        self.assertEqual(self.json("overview", "a.wav"), one)
+        one = {"path": "a.wav", "sampleRate": 8000, "channels": 1, "frames": 514, "durationSeconds": 0.06425, "framesPerPoint": 256,
+               "points": [[0, 0], [0, 127], [-64, 32]]}
+        self.assertEqual(self.record("overview", "a.wav"), one)
         several = self.json("overview", "a.wav", "bad.wav", "b&<é.wav", status=1)
         self.assertEqual([several[0], *(set(item) for item in several[1:])], [one, {"path", "error"}, set(one)])
         self.assertEqual(self.lines("overview", "a.wav")[0].split("\t")[:5], ["a.wav", "0.064250", "514", "-64", "127"])
@@ -181,9 +182,9 @@ class Output(CommandTest):
         for name in ("a.flac", "a.mp3"):
             subprocess.run(["ffmpeg", "-v", "error", "-i", "a.wav", name], cwd=self.folder, check=True,
                            stdin=subprocess.DEVNULL)
-        expected = self.json("overview", "a.wav")
-        self.assertEqual(self.json("overview", "a.flac") | {"path": "a.wav"}, expected)
-        near = self.json("overview", "a.mp3")
+        expected = self.record("overview", "a.wav")
+        self.assertEqual(self.record("overview", "a.flac") | {"path": "a.wav"}, expected)
+        near = self.record("overview", "a.mp3")
         self.assertEqual(near["frames"], 50000)
         for point, other in zip(near["points"], expected["points"]):
             self.assertTrue(all(abs(a - b) <= 8 for a, b in zip(point, other)), (point, other))
@@ -193,9 +194,9 @@ class Output(CommandTest):
             self.assertEqual((self.folder / name).read_bytes(), content)
             self.assertIn("install libktfiles-ffmpeg", self.failure("overview", name, env=self.without_decoders()))
         shutil.copy(MEDIA / "tone-adpcm.wav", self.folder)
-        computed = self.json("overview", "tone-adpcm.wav", "--store")
+        computed = self.record("overview", "tone-adpcm.wav", "--store")
         self.assertTrue(computed["stored"])
-        self.assertEqual(self.json("overview", "tone-adpcm.wav", "--stored")["points"], computed["points"])
+        self.assertEqual(self.record("overview", "tone-adpcm.wav", "--stored")["points"], computed["points"])
 
     def test_mistakes(self):
         self.write("a.wav", wave())
@@ -221,7 +222,7 @@ class Store(CommandTest):
             with self.subTest(name):
                 original = (MEDIA / name).read_bytes()
                 path = self.write(name, original)
-                points = self.json("overview", name)["points"]
+                points = self.record("overview", name)["points"]
                 self.assertIn("has no stored overview", self.failure("overview", "--stored", name))
                 count = f"{len(points)} points"
                 self.assertEqual(self.lines("overview", "--store", "--dry-run", name),
@@ -230,10 +231,10 @@ class Store(CommandTest):
                 self.assertIn(f"stored its overview, {count}; backup",
                               self.lines("overview", "--store", "--backup", name)[0])
                 self.assertEqual((self.folder / (name + ".bak")).read_bytes(), original)
-                self.assertEqual(self.json("overview", "--stored", name)["points"], points)
-                self.assertEqual(self.json("overview", name)["points"], points)
+                self.assertEqual(self.record("overview", "--stored", name)["points"], points)
+                self.assertEqual(self.record("overview", name)["points"], points)
                 stored = path.read_bytes()
-                again = self.json("overview", "--store", "--in-place", name)
+                again = self.record("overview", "--store", "--in-place", name)
                 self.assertEqual((again["stored"], again["changed"], again["points"]), (True, False, points))
                 self.assertEqual(path.read_bytes(), stored)
         self.assert_no_litter(*self.SOUNDS, *(name + ".bak" for name in self.SOUNDS))
@@ -248,10 +249,10 @@ class Store(CommandTest):
         for where in ("copy", "in place"):
             options = ("--in-place",) if where == "in place" else ()
             self.write("a.wav", wave(chunk(b"LGWV", struct.pack("<IIbb", 100, 0, -3, 3)), frames=100))
-            self.assertEqual(self.json("overview", "--stored", "a.wav")["points"], [[-3, 3]])
-            self.assertTrue(self.json("overview", "--store", "a.wav", *options)["changed"])
-            self.assertNotEqual(self.json("overview", "--stored", "a.wav")["points"], [[-3, 3]])
-            ids = [item["id"] for item in self.json("chunks", "a.wav")["chunks"]]
+            self.assertEqual(self.record("overview", "--stored", "a.wav")["points"], [[-3, 3]])
+            self.assertTrue(self.record("overview", "--store", "a.wav", *options)["changed"])
+            self.assertNotEqual(self.record("overview", "--stored", "a.wav")["points"], [[-3, 3]])
+            ids = [item["id"] for item in self.record("chunks", "a.wav")["chunks"]]
             self.assertEqual(ids.count("LGWV"), 1)
 
     def test_stored_overviews_that_do_not_fit(self):

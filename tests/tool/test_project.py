@@ -48,13 +48,13 @@ class ProjectTest(CommandTest):
 
 class Show(ProjectTest):
     def test_json_has_the_keys_of_the_dictionaries(self):
-        shown = self.json("project", "Song.fuguex")
+        shown = self.record("project", "Song.fuguex")
         self.assertEqual(shown["projectInfo"], {
             "BundleVersion": 2, "VariantNames": {"0": "Song", "1": "Other"},
             "VariantNamesV2": {"0": "{PROJECT_NAME}", "1": "Other"}, "ActiveVariant": 1, "HasProjectFolder": False,
             "LastSavedFrom": "Studio 1.0", "Data": "AQIDBA==", "Own": [1.5, True]})
         first, second = shown["alternatives"]
-        self.assertEqual((first["name"], first["active"], first["metaData"]), ("Song", False, None))
+        self.assertEqual((first["name"], first["active"], "metaData" in first), ("Song", False, False))
         self.assertEqual((second["name"], second["active"], second["metaData"]), ("Other", True, self.meta))
         counts = {item["key"]: (item["count"], item["missing"]) for item in second["media"]}
         self.assertEqual((counts["AudioFiles"], counts["VideoFiles"], counts["PlaybackFiles"]), ((2, 1), (1, 1), (0, 0)))
@@ -64,12 +64,12 @@ class Show(ProjectTest):
         self.assertEqual(self.lines("project", "media", "Song.fuguex"),
                          [f"audio\tmissing\t{media}/gone.wav", f"audio\t\t{media}/there.wav",
                           f"video\tmissing\t{media}/gone.mov"])
-        self.assertEqual(self.json("project", "media", "Song.fuguex", "--missing")["media"],
+        self.assertEqual(self.record("project", "media", "Song.fuguex", "--missing")["media"],
                          [{"key": "AudioFiles", "file": f"{media}/gone.wav", "exists": False},
                           {"key": "VideoFiles", "file": f"{media}/gone.mov", "exists": False}])
         self.assertIn("no alternative 7", self.failure("project", "media", "Song.fuguex", "--alternative", "7"))
 
-    def json(self, *arguments, **options):
+    def json(self, *arguments, **options):  # behind the object
         return json.loads(self.run_command(*arguments, "--json", **options).stdout)
 
     def test_what_is_no_package(self):
@@ -78,7 +78,7 @@ class Show(ProjectTest):
         for name in ("Empty.fuguex", "File.fuguex", "None.fuguex"):
             for arguments in (["project"], ["project", "media"], ["project", "backup"]):
                 self.failure(*arguments, name)
-        shown = json.loads(self.run_command("project", "--json", "None.fuguex", status=1).stdout)
+        shown, = json.loads(self.run_command("project", "--json", "None.fuguex", status=1).stdout)
         self.assertEqual(shown, {"path": "None.fuguex", "error": "file not found"})
         for arguments in (["project"], ["project", "restore", "Song.fuguex"],
                           ["project", "rename-alternative", "Song.fuguex", "-1", "x"]):
@@ -123,7 +123,7 @@ class Edits(ProjectTest):
 
     def test_rename(self):
         self.run_command("project", "rename-alternative", "--dry-run", "Song.fuguex", "1", "Song, slower")
-        self.assertEqual(self.json("project", "Song.fuguex")["alternatives"][1]["name"], "Other")
+        self.assertEqual(self.record("project", "Song.fuguex")["alternatives"][1]["name"], "Other")
         self.run_command("project", "rename-alternative", "--backup", "Song.fuguex", "1", "Song, slower")
         info = plistlib.loads(self.read("Resources/ProjectInformation.plist"))
         self.assertEqual(info["VariantNamesV2"], {"0": "{PROJECT_NAME}", "1": "{PROJECT_NAME}, slower"})
@@ -132,12 +132,12 @@ class Edits(ProjectTest):
         backup = plistlib.loads(self.read("Resources/ProjectInformation.plist.bak"))
         self.assertEqual((backup["VariantNames"]["1"], backup["LastSavedFrom"]), ("Other", "Studio 1.0"))
         os.rename(self.package, self.folder / "Tune.fuguex")
-        self.assertEqual(self.json("project", "Tune.fuguex")["projectInfo"]["VariantNames"],
+        self.assertEqual(self.record("project", "Tune.fuguex")["projectInfo"]["VariantNames"],
                          {"0": "Tune", "1": "Tune, slower"})
         self.assertIn("no alternative 2", self.failure("project", "rename-alternative", "Tune.fuguex", "2", "x"))
         # A value in brackets is a text as any other.
         self.run_command("project", "rename-alternative", "--in-place", "Tune.fuguex", "1", "[Intro]")
-        self.assertEqual(self.json("project", "Tune.fuguex")["alternatives"][1]["name"], "[Intro]")
+        self.assertEqual(self.record("project", "Tune.fuguex")["alternatives"][1]["name"], "[Intro]")
 
     def test_interrupted_exchange_is_told_and_settled(self):
         self.put(BACKUPS + "00/ProjectData", b"old")
@@ -148,7 +148,7 @@ class Edits(ProjectTest):
                 if (self.package / folder / name).exists():
                     pair[side] = (self.package / folder / name).stat().st_ino
         self.put(ALTERNATIVE + ".exchange.dummy", plistlib.dumps({"Backup": "00", "Items": after}))
-        self.assertEqual(self.json("project", "Song.fuguex")["alternatives"][1]["interruptedExchange"], "00")
+        self.assertEqual(self.record("project", "Song.fuguex")["alternatives"][1]["interruptedExchange"], "00")
         self.failure("project", "backup", "Song.fuguex")
         self.assertIn("was cut short; completed it", self.lines("project", "restore", "Song.fuguex", "00")[0])
         self.assertEqual((self.read(ALTERNATIVE + "ProjectData"), self.read(BACKUPS + "00/ProjectData")),
@@ -174,7 +174,7 @@ class Edits(ProjectTest):
             self.cut_short()
             self.run_command("project", "settle", "--dry-run", *options, "Song.fuguex")
             self.assertTrue(record.exists())
-            told = self.json("project", "settle", *options, "Song.fuguex")
+            told = self.record("project", "settle", *options, "Song.fuguex")
             self.assertEqual(told["backup"], "00")
             self.assertFalse(record.exists())
             self.assertEqual(self.read(ALTERNATIVE + "ProjectData"), data)
@@ -189,7 +189,8 @@ class Edits(ProjectTest):
         self.run_command("project", "settle", "--undo", "--with", "Song.fuguex/" + BACKUPS + "00", "Song.fuguex")
         self.assertEqual(self.read(ALTERNATIVE + "ProjectData"), b"data")
         record.write_bytes(b"nonsense")
-        self.assertIsNone(self.json("project", "Song.fuguex")["alternatives"][1]["interruptedExchange"])
+        shown = self.record("project", "Song.fuguex")["alternatives"][1]
+        self.assertEqual((shown["isExchangeInterrupted"], "interruptedExchange" in shown), (True, False))
         for command in (["backup"], ["settle"], ["settle", "--undo"]):
             self.failure("project", *command, "Song.fuguex")
         self.assertIn("--forget", self.failure("project", "restore", "Song.fuguex", "00"))

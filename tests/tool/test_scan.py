@@ -50,7 +50,10 @@ class Scan(CommandTest):
             (self.folder / "lib" / name).write_bytes(content)
         (self.folder / "lib/dangling.aif").symlink_to("nowhere")
         result = self.run_command("scan", "lib", "missing", "--json", status=1)
-        self.assertEqual([item["path"] for item in json.loads(result.stdout)], ["lib/good.aiff"])
+        found = json.loads(result.stdout)
+        self.assertEqual([item["path"] for item in found if "error" not in item], ["lib/good.aiff"])
+        self.assertEqual([line.split(": ", 1)[1] for line in result.stderr.decode().splitlines()],
+                         [f"{item['path']}: {item['error']}" for item in found if "error" in item])
         self.assertEqual([line.split(": ")[1] for line in result.stderr.decode().splitlines()],
                          ["lib/a.aiff", "lib/b.CAF", "lib/dangling.aif", "missing"])
 
@@ -97,7 +100,7 @@ class Scan(CommandTest):
         rows = list(csv.reader(io.StringIO(self.run_command("scan", "--csv", "lib", status=1).stdout.decode(), newline="")))
         self.assertEqual((rows[1][0], rows[1][rows[0].index("genre")]), ("lib/" + name, self.NASTY))
         piped = self.run_command("scan", "--json", "lib", status=1)
-        self.assertEqual([item["genre"] for item in json.loads(piped.stdout)], [self.NASTY])
+        self.assertEqual([item["genre"] for item in json.loads(piped.stdout) if "error" not in item], [self.NASTY])
         self.assertNotIn("\u202e", piped.stdout.decode())
         self.assertIn("é", piped.stdout.decode())
         self.assertIn("bad\u202e.caf", piped.stderr.decode())

@@ -141,7 +141,7 @@ class Sidecars(CommandTest):
             edits = [subprocess.Popen([KTFILES, "chunks", "add", name, f"{name[2]}{i:03}", "--sidecar", "ovw", "-q"],
                                       stdin=subprocess.DEVNULL, cwd=self.folder) for i in range(6) for name in names]
             self.assertEqual([edit.wait(120) for edit in edits], [0] * 12)
-            ids = [item["id"] for item in self.json("chunks", "s.ktmd")["chunks"]]
+            ids = [item["id"] for item in self.record("chunks", "s.ktmd")["chunks"]]
             self.assertEqual(sorted(i for i in ids if i[1:].isdigit()),
                              sorted(f"{name[2]}{i:03}" for i in range(6) for name in names))
             self.assert_no_litter("s.ktmd", *names)

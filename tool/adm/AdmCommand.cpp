@@ -5,11 +5,13 @@
 #include "tool/adm/AdmTree.h"
 #include "tool/shared/access/FileAccess.h"
 #include "tool/shared/arguments/CommandLine.h"
+#include "tool/shared/input/FileByFile.h"
 #include "tool/shared/output/Failure.h"
 #include "tool/shared/output/JsonRecords.h"
 #include "tool/shared/output/Progress.h"
 
 #include <limits>
+#include <utility>
 
 namespace {
 
@@ -17,7 +19,7 @@ constexpr std::size_t kFewBlocks = 5;
 constexpr std::size_t kFewDiagnostics = 10;
 
 struct AdmArguments {
-    std::vector<std::string> files;
+    FileArguments files;
     bool isLenient = false;
     bool isCheck = false;
     bool isLong = false;
@@ -91,77 +93,71 @@ public:
         : arguments_(arguments),
           options_(options),
           form_(outputForm(options)),
-          json_(arguments.files.size() > 1 ? JsonRecords::Shape::array : JsonRecords::Shape::single)
+          hasSeveral_(arguments.files.maybeSeveral()),
+          json_(options)
     {
     }
 
     bool run()
     {
-        bool good = true;
-        for (const std::string& path : arguments_.files) {
-            if (output_.failed())
-                break;
-            if (&path != &arguments_.files.front())
-                output_.write(form_ == Form::table && !arguments_.isCheck ? "\n" : "");
-            if (!runFile(path))
-                good = false;
-        }
+        bool areFine = true;
+        const bool good = forEachFile(
+            arguments_.files, options_, [&](const FoundFile& file) { areFine = runFile(file) && areFine; },
+            [&](const std::string& path, const std::string& text) {
+                if (form_ == Form::json)
+                    json_.addFailure(path, text);
+            });
         if (form_ == Form::json)
             json_.finish();
-        return good;
+        return good && areFine;
     }
 
 private:
-    bool runFile(const std::string& path)
+    bool runFile(const FoundFile& file)
     {
-        try {
-            const FileAccess access = accessForReading(path, {.quiet = options_.quiet});
-            const bool tells = arguments_.isCheck || arguments_.isLenient;
-            AdmSource source(path);
-            ReadDocument read = readDocument(source, arguments_, options_.quiet, tells ? Diagnose::yes : Diagnose::no);
-            // To know the place of everything costs a ninth of the time, which only documents with a problem pay.
-            if (!read.isComplete && !tells)
-                read = readDocument(source, arguments_, options_.quiet, Diagnose::yes);
-            if (arguments_.isCheck) {
-                for (ADMDiagnostic& problem : checkFurther(source, *read.document, read.isComplete))
-                    read.diagnostics.push_back(std::move(problem));
-                return check(path, read);
-            }
-            if (!read.isComplete) {
-                const ADMDiagnostic last = read.diagnostics.back();
-                read.diagnostics.pop_back();
-                reportDiagnostics(path, read.diagnostics);
-                return fail(path, last);
-            }
-            show(path, read);
-            return true;
-        } catch (const Failure& failure) {
-            return fail(path, path, failure.what());
+        const std::string& path = file.path;
+        const FileAccess access = accessForReading(path, {.quiet = options_.quiet});
+        const bool tells = arguments_.isCheck || arguments_.isLenient;
+        AdmSource source(path);
+        if (file.isBelowFolder() && !source.isAudio())
+            throw OtherKind("is XML, of any kind", OtherKind::Kind::unknown); // web pages begin with a tag, too
+        ReadDocument read = readDocument(source, arguments_, options_.quiet, tells ? Diagnose::yes : Diagnose::no);
+        // To know the place of everything costs a ninth of the time, which only documents with a problem pay.
+        if (!read.isComplete && !tells)
+            read = readDocument(source, arguments_, options_.quiet, Diagnose::yes);
+        if (arguments_.isCheck) {
+            for (ADMDiagnostic& problem : checkFurther(source, *read.document, read.isComplete))
+                read.diagnostics.push_back(std::move(problem));
+            return check(path, read);
         }
+        if (!read.isComplete) {
+            const ADMDiagnostic last = read.diagnostics.back();
+            read.diagnostics.pop_back();
+            reportDiagnostics(path, read.diagnostics);
+            return fail(path, last);
+        }
+        show(path, read);
+        return true;
     }
 
     bool fail(const std::string& path, const ADMDiagnostic& problem)
     {
-        return fail(path, placeText(path, problem), problemText(problem));
-    }
-
-    bool fail(const std::string& path, const std::string& place, const std::string& text)
-    {
-        reportFailure(place, text);
+        reportFailure(placeText(path, problem), problemText(problem));
         if (form_ == Form::json)
-            json_.addFailure(path, text);
+            json_.addFailure(path, problemText(problem));
         return false;
     }
 
     bool check(const std::string& path, const ReadDocument& read)
     {
         if (form_ == Form::json) {
-            JsonWriter& json = json_.next();
+            JsonWriter& json = json_.begin();
             json.beginObject();
             json.member("path", path);
             json.key("problems");
             writeDiagnostics(json, read.diagnostics);
             json.endObject();
+            json_.end();
         } else if (form_ != Form::none) {
             for (const ADMDiagnostic& diagnostic : read.diagnostics)
                 output_.print("{}: {}\n", printable(placeText(path, diagnostic)), printable(problemText(diagnostic)));
@@ -172,14 +168,17 @@ private:
     void show(const std::string& path, const ReadDocument& read)
     {
         if (form_ == Form::json) {
-            writeAdmJson(json_.next(), path, *read.document, arguments_.isLenient ? &read.diagnostics : nullptr);
+            writeAdmJson(json_.begin(), path, *read.document, arguments_.isLenient ? &read.diagnostics : nullptr);
+            json_.end();
             return;
         }
-        if (form_ == Form::table)
+        if (form_ == Form::table) {
+            output_.write(std::exchange(hasShown_, true) ? "\n" : "");
             showTitle(path, *read.document);
+        }
         if (form_ != Form::none) {
             const bool isDrawn = form_ == Form::table;
-            const bool isPrefixed = !isDrawn && arguments_.files.size() > 1;
+            const bool isPrefixed = !isDrawn && hasSeveral_;
             AdmTreeWriter writer(output_, {.isDrawn = isDrawn,
                                            .hasColor = usesColor(options_.color),
                                            .hasBlockIDs = arguments_.isLong,
@@ -227,6 +226,8 @@ private:
     const AdmArguments& arguments_;
     const OutputOptions& options_;
     Form form_;
+    bool hasSeveral_;
+    bool hasShown_ = false;
     Output& output_ = Output::standard();
     JsonRecords json_;
 };
@@ -236,7 +237,7 @@ void declareAdm(CommandLine& commandLine)
     static AdmArguments arguments;
     Verb& verb = commandLine.addVerb("adm", "Show what the ADM documents of audio files, or in XML files, describe",
                                      [&commandLine] { return AdmCommand(arguments, commandLine.output()).run(); });
-    CommandLine::addFiles(verb, arguments.files).required().describe("Audio files and XML files");
+    CommandLine::addFiles(verb, arguments.files).describe("Audio files, folders of them, and XML files");
     verb.addFlag("--long", arguments.isLong, "Show every block, with its ID");
     verb.addFlag("--lenient", arguments.isLenient, "Let pass what can be passed over, and list it");
     verb.addFlag("--check", arguments.isCheck, "Print only what is wrong: FILE:LINE:COLUMN: NAME: REASON");

@@ -7,9 +7,15 @@
 
 namespace {
 
-std::optional<std::int64_t> timeOrNull(std::int64_t microseconds)
+std::optional<std::int64_t> knownTime(std::int64_t microseconds)
 {
     return microseconds == kADMInvalidTime ? std::nullopt : std::optional(microseconds);
+}
+
+template <class Number>
+std::optional<Number> positive(Number number)
+{
+    return number > 0 ? std::optional(number) : std::nullopt;
 }
 
 void writeLabels(JsonWriter& json, std::string_view key, const ADMLabels& labels)
@@ -26,12 +32,12 @@ void writePosition(JsonWriter& json, const ADMPosition& position)
     json.key("position");
     json.beginObject();
     json.member("cartesian", position.cartesian);
-    json.member("X", position.X);
-    json.member("Y", position.Y);
-    json.member("Z", position.Z);
-    json.member("azimuth", position.azimuth);
-    json.member("elevation", position.elevation);
-    json.member("distance", position.distance);
+    json.knownMember("X", position.X);
+    json.knownMember("Y", position.Y);
+    json.knownMember("Z", position.Z);
+    json.knownMember("azimuth", position.azimuth);
+    json.knownMember("elevation", position.elevation);
+    json.knownMember("distance", position.distance);
     json.endObject();
 }
 
@@ -39,11 +45,11 @@ void writeMembers(JsonWriter& json, const ADMAudioProgramme& programme)
 {
     json.member("audioProgrammeID", programme.audioProgrammeID());
     json.member("index", programme.index());
-    json.member("audioProgrammeName", programme.audioProgrammeName());
-    json.member("audioProgrammeLanguage", programme.audioProgrammeLanguage());
-    json.member("start", timeOrNull(programme.exactStart()));
-    json.member("end", timeOrNull(programme.exactEnd()));
-    json.member("maxDuckingDepth", programme.maxDuckingDepth());
+    json.knownMember("audioProgrammeName", programme.audioProgrammeName());
+    json.knownMember("audioProgrammeLanguage", programme.audioProgrammeLanguage());
+    json.knownMember("start", knownTime(programme.exactStart()));
+    json.knownMember("end", knownTime(programme.exactEnd()));
+    json.knownMember("maxDuckingDepth", programme.maxDuckingDepth());
     json.member("audioContentIDs", programme.audioContentIDs());
     writeLabels(json, "audioProgrammeLabels", programme.audioProgrammeLabels());
 }
@@ -52,8 +58,8 @@ void writeMembers(JsonWriter& json, const ADMAudioContent& content)
 {
     json.member("audioContentID", content.audioContentID());
     json.member("index", content.index());
-    json.member("audioContentName", content.audioContentName());
-    json.member("audioContentLanguage", content.audioContentLanguage());
+    json.knownMember("audioContentName", content.audioContentName());
+    json.knownMember("audioContentLanguage", content.audioContentLanguage());
     json.member("audioObjectIDRefs", content.audioObjectIDRefs());
     writeLabels(json, "audioContentLabels", content.audioContentLabels());
     json.member("dialogueMode", content.dialogueMode());
@@ -65,9 +71,9 @@ void writeMembers(JsonWriter& json, const ADMAudioContent& content)
 void writeMembers(JsonWriter& json, const ADMAudioObject& object)
 {
     json.member("audioObjectID", object.audioObjectID());
-    json.member("audioObjectName", object.audioObjectName());
-    json.member("start", timeOrNull(object.exactStart()));
-    json.member("duration", timeOrNull(object.exactDuration()));
+    json.knownMember("audioObjectName", object.audioObjectName());
+    json.knownMember("start", knownTime(object.exactStart()));
+    json.knownMember("duration", knownTime(object.exactDuration()));
     json.member("dialogueMode", object.dialogueMode());
     json.member("importance", object.importance());
     json.member("interact", object.interact());
@@ -76,31 +82,31 @@ void writeMembers(JsonWriter& json, const ADMAudioObject& object)
     json.member("audioObjectIDRefs", object.audioObjectIDRefs());
     json.member("audioTrackUIDRefs", object.audioTrackUIDRefs());
     writeLabels(json, "audioObjectLabels", object.audioObjectLabels());
-    json.member("gain", object.gain());
+    json.knownMember("gain", object.gain());
     json.member("gainUnit", object.gainUnit());
     json.member("headLocked", object.headLocked());
     json.member("mute", object.mute());
     json.key("polarOffset");
     json.beginObject();
-    json.member("azimuth", object.polarOffset().azimuth);
-    json.member("elevation", object.polarOffset().elevation);
-    json.member("distance", object.polarOffset().distance);
+    json.knownMember("azimuth", object.polarOffset().azimuth);
+    json.knownMember("elevation", object.polarOffset().elevation);
+    json.knownMember("distance", object.polarOffset().distance);
     json.endObject();
     json.key("cartesianOffset");
     json.beginObject();
-    json.member("X", object.cartesianOffset().X);
-    json.member("Y", object.cartesianOffset().Y);
-    json.member("Z", object.cartesianOffset().Z);
+    json.knownMember("X", object.cartesianOffset().X);
+    json.knownMember("Y", object.cartesianOffset().Y);
+    json.knownMember("Z", object.cartesianOffset().Z);
     json.endObject();
 }
 
 void writeMembers(JsonWriter& json, const ADMAudioPackFormat& pack)
 {
     json.member("audioPackFormatID", pack.audioPackFormatID());
-    json.member("audioPackFormatName", pack.audioPackFormatName());
+    json.knownMember("audioPackFormatName", pack.audioPackFormatName());
     json.member("type", pack.type());
     json.member("importance", signedImportance(pack));
-    json.member("absoluteDistance", pack.absoluteDistance());
+    json.knownMember("absoluteDistance", pack.absoluteDistance());
     json.member("audioChannelFormatIDRefs", pack.audioChannelFormatIDRefs());
     json.member("audioPackFormatIDRefs", pack.audioPackFormatIDRefs());
 }
@@ -114,9 +120,9 @@ void writeObjectBlock(JsonWriter& json, const ADMAudioBlockFormat_Object& block)
     json.member("hasPolarAzimuth", block.hasPolarAzimuth());
     json.member("hasPolarElevation", block.hasPolarElevation());
     json.member("hasPolarDistance", block.hasPolarDistance());
-    json.member("width", block.width());
-    json.member("height", block.height());
-    json.member("depth", block.depth());
+    json.knownMember("width", block.width());
+    json.knownMember("height", block.height());
+    json.knownMember("depth", block.depth());
     json.member("hasWidth", block.hasWidth());
     json.member("hasHeight", block.hasHeight());
     json.member("hasDepth", block.hasDepth());
@@ -134,10 +140,10 @@ void writeBlock(JsonWriter& json, const ADMAudioBlockFormat& block)
     json.member("type", block.type());
     json.member("index", block.index());
     json.member("blockIndex", block.blockIndex());
-    json.member("rtime", timeOrNull(block.exactRtime()));
-    json.member("duration", timeOrNull(block.exactDuration()));
+    json.knownMember("rtime", knownTime(block.exactRtime()));
+    json.knownMember("duration", knownTime(block.exactDuration()));
     json.member("hasGain", block.hasGain());
-    json.member("gain", block.gain());
+    json.knownMember("gain", block.gain());
     json.member("gainUnit", block.gainUnit());
     json.member("importance", block.importance());
     json.member("headLocked", block.headLocked());
@@ -145,7 +151,7 @@ void writeBlock(JsonWriter& json, const ADMAudioBlockFormat& block)
     if (const auto* object = dynamic_cast<const ADMAudioBlockFormat_Object*>(&block)) {
         writeObjectBlock(json, *object);
     } else if (const auto* speaker = dynamic_cast<const ADMAudioBlockFormat_DirectSpeaker*>(&block)) {
-        json.member("speakerLabel", speaker->speakerLabel());
+        json.knownMember("speakerLabel", speaker->speakerLabel());
         writePosition(json, speaker->position());
     }
     json.endObject();
@@ -154,7 +160,7 @@ void writeBlock(JsonWriter& json, const ADMAudioBlockFormat& block)
 void writeMembers(JsonWriter& json, const ADMAudioChannelFormat& channel)
 {
     json.member("audioChannelFormatID", channel.audioChannelFormatID());
-    json.member("audioChannelFormatName", channel.audioChannelFormatName());
+    json.knownMember("audioChannelFormatName", channel.audioChannelFormatName());
     json.member("type", channel.type());
     json.key("audioBlockFormat");
     json.beginArray();
@@ -166,20 +172,20 @@ void writeMembers(JsonWriter& json, const ADMAudioChannelFormat& channel)
 void writeMembers(JsonWriter& json, const ADMAudioStreamFormat& stream)
 {
     json.member("audioStreamFormatID", stream.audioStreamFormatID());
-    json.member("audioStreamFormatName", stream.audioStreamFormatName());
+    json.knownMember("audioStreamFormatName", stream.audioStreamFormatName());
     json.member("format", stream.format());
-    json.member("audioChannelFormatIDRef", stream.audioChannelFormatIDRef());
-    json.member("audioPackFormatIDRef", stream.audioPackFormatIDRef());
+    json.knownMember("audioChannelFormatIDRef", stream.audioChannelFormatIDRef());
+    json.knownMember("audioPackFormatIDRef", stream.audioPackFormatIDRef());
     json.member("audioTrackFormatIDRefs", stream.audioTrackFormatIDRefs());
 }
 
 void writeMembers(JsonWriter& json, const ADMAudioTrackFormat& track)
 {
     json.member("audioTrackFormatID", track.audioTrackFormatID());
-    json.member("audioTrackFormatName", track.audioTrackFormatName());
-    json.member("formatLabel", track.formatLabel());
-    json.member("formatDefinition", track.formatDefinition());
-    json.member("audioStreamFormatRefID", track.audioStreamFormatRefID());
+    json.knownMember("audioTrackFormatName", track.audioTrackFormatName());
+    json.knownMember("formatLabel", track.formatLabel());
+    json.knownMember("formatDefinition", track.formatDefinition());
+    json.knownMember("audioStreamFormatRefID", track.audioStreamFormatRefID());
     json.member("formatIDRefs", track.formatIDRefs());
 }
 
@@ -187,11 +193,11 @@ void writeMembers(JsonWriter& json, const ADMAudioTrackUID& track)
 {
     json.member("audioTrackUIDID", track.audioTrackUIDID());
     json.member("index", track.index());
-    json.member("sampleRate", track.sampleRate());
-    json.member("bitDepth", track.bitDepth());
-    json.member("audioTrackFormatIDRef", track.audioTrackFormatIDRef());
-    json.member("audioChannelFormatIDRef", track.audioChannelFormatIDRef());
-    json.member("audioPackFormatIDRef", track.audioPackFormatIDRef());
+    json.knownMember("sampleRate", positive(track.sampleRate()));
+    json.knownMember("bitDepth", positive(track.bitDepth()));
+    json.knownMember("audioTrackFormatIDRef", track.audioTrackFormatIDRef());
+    json.knownMember("audioChannelFormatIDRef", track.audioChannelFormatIDRef());
+    json.knownMember("audioPackFormatIDRef", track.audioPackFormatIDRef());
 }
 
 template <class Element>
@@ -238,10 +244,10 @@ void writeDiagnostics(JsonWriter& json, const std::vector<ADMDiagnostic>& diagno
     for (const ADMDiagnostic& diagnostic : diagnostics) {
         json.newLine();
         json.beginObject();
-        json.member("line", diagnostic.position.line);
-        json.member("column", diagnostic.position.column);
+        if (diagnostic.position.line > 0)
+            json.member("line", diagnostic.position.line).knownMember("column", positive(diagnostic.position.column));
         json.member("name", diagnostic.kind);
-        json.member("elementID", diagnostic.elementID);
+        json.knownMember("elementID", diagnostic.elementID);
         json.member("reason", diagnostic.text);
         json.endObject();
     }

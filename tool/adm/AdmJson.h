@@ -8,8 +8,9 @@
 
 class JsonWriter;
 
-/// The keys "path", one for each kind of element, and "diagnostics" unless that is null. Times are microseconds, null
-/// where they are not given. Nothing but one element is held at a time; no line break behind the object.
+/// The keys "path", one for each kind of element, and "diagnostics" unless that is null. Times are microseconds.
+/// What is not given or no number has no key. Nothing but one element is held at a time; no line break behind the
+/// object.
 void writeAdmJson(JsonWriter& json, const std::string& path, const ADMDocument& document,
                   const std::vector<ADMDiagnostic>* diagnostics);
 

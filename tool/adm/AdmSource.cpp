@@ -2,6 +2,7 @@
 
 #include "tool/shared/edits/EditProblems.h"
 #include "tool/shared/input/ChunkBody.h"
+#include "tool/shared/input/FoundFile.h"
 #include "tool/shared/input/InputFile.h"
 #include "tool/shared/output/Failure.h"
 
@@ -52,9 +53,11 @@ AdmSource::AdmSource(const std::string& path)
     requireOK(file_.OpenForChunks(referenceTo(path), 0));
     const std::int64_t length = file_.GetEOF();
     if (length == 0)
-        throw Failure("is empty");
+        throw OtherKind("is empty", OtherKind::Kind::unknown);
     if (file_.HasChunks()) {
         isAudio_ = true;
+        if (!surveyChunks(file_, fourCC("axml")).found)
+            throw OtherKind("has no chunk \"axml\"", OtherKind::Kind::audio);
         const ChunkBody chunk = requireChunk(file_, fourCC("axml"));
         begin_ = chunk.offset;
         end_ = chunk.offset + chunk.size;
@@ -67,7 +70,8 @@ AdmSource::AdmSource(const std::string& path)
     long actual = 0;
     file_.Read(head.data(), 0, static_cast<long>(std::min<std::int64_t>(length, head.size())), &actual);
     if (!looksLikeXml({head.data(), static_cast<std::size_t>(actual)}))
-        throw Failure("neither XML nor an audio file known here");
+        throw OtherKind("neither XML nor an audio file known here",
+                        isCalledContainer(path) ? OtherKind::Kind::unknown : OtherKind::Kind::audio);
     end_ = length;
 }
 

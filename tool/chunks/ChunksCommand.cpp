@@ -2,6 +2,8 @@
 
 #include "tool/shared/access/FileAccess.h"
 #include "tool/shared/arguments/CommandLine.h"
+#include "tool/shared/input/CodingWords.h"
+#include "tool/shared/input/FileByFile.h"
 #include "tool/shared/input/InputFile.h"
 #include "tool/shared/output/Failure.h"
 #include "tool/shared/output/JsonRecords.h"
@@ -14,28 +16,32 @@ namespace {
 // Writes the list of one file chunk by chunk: files of hundreds of thousands of chunks are listed, not held.
 class ChunkListWriter {
 public:
-    /// With `several` files each line, or heading, says which.
-    ChunkListWriter(const OutputOptions& options, JsonRecords& json, std::string path, bool several)
+    /// With `several` files each line, or heading, says which. One that `follows` another is set off from it.
+    ChunkListWriter(const OutputOptions& options, JsonRecords& json, std::string path, bool several, bool follows)
         : json_(json),
           form_(outputForm(options)),
           color_(usesColor(options.color)),
           several_(several),
+          follows_(follows),
           path_(std::move(path))
     {
     }
 
-    void begin(const ContainerExtent& extent)
+    /// `containerName` is what people call it.
+    void begin(const ContainerExtent& extent, const std::string& containerName)
     {
         extent_ = extent;
-        begun_ = true;
         if (form_ == Form::json) {
-            JsonWriter& json = json_.next();
+            JsonWriter& json = json_.begin();
             json.beginObject();
-            json.member("path", path_).member("container", fourCCText(extent.id)).member("containerEnd", extent.end);
+            json.member("path", path_).member("container", fourCCText(extent.id));
+            json.member("containerName", containerName);
+            json.member("containerEnd", extent.end).member("fileLength", extent.fileLength);
             json.key("chunks").beginArray();
             list_ = &json;
         } else if (form_ == Form::table) {
-            output_.print("{}  {}, {} bytes\n", printable(path_), fourCCText(extent.id), extent.end);
+            output_.print("{}{}  {}, {} bytes\n", follows_ ? "\n" : "", printable(path_), fourCCText(extent.id),
+                          extent.end);
             const int width = std::max(static_cast<int>(fmt::formatted_size("{}", extent.fileLength)), 6);
             table_.emplace(std::vector<Table::Column>{
                 {"ID", Align::left, 4}, {"OFFSET", Align::right, width}, {"SIZE", Align::right, width}});
@@ -61,14 +67,12 @@ public:
         return !output_.failed();
     }
 
-    /// `error` is empty when all went well.
+    /// Of a list that has begun; `error` is empty when all went well.
     void end(const std::string& error)
     {
-        if (form_ == Form::json && !begun_)
-            json_.addFailure(path_, error);
-        else if (form_ == Form::json)
+        if (form_ == Form::json)
             endList(error);
-        else if (form_ == Form::table && begun_ && extent_.end < extent_.fileLength)
+        else if (form_ == Form::table && extent_.end < extent_.fileLength)
             output_.print("{} bytes follow the container\n", extent_.fileLength - extent_.end);
     }
 
@@ -79,21 +83,22 @@ private:
         if (!error.empty())
             list_->member("error", error);
         list_->endObject();
+        json_.end();
     }
 
     JsonRecords& json_;
     JsonWriter* list_ = nullptr; // of the file's object, once that has begun
     Form form_;
     bool color_;
-    bool several_;
+    bool several_, follows_;
     std::string path_;
-    bool begun_ = false;
     ContainerExtent extent_;
     std::optional<Table> table_;
     Output& output_ = Output::standard();
 };
 
-void listFile(const std::string& path, ChunkListWriter& writer, bool quiet)
+// Of a file whose list has begun no Failure is thrown: `writer` ends it with the problem, which is returned.
+std::string listFile(const std::string& path, ChunkListWriter& writer, bool quiet)
 {
     const FileAccess access = accessForReading(path, {.quiet = quiet});
     CAudioFileIO file;
@@ -103,55 +108,53 @@ void listFile(const std::string& path, ChunkListWriter& writer, bool quiet)
     const std::int32_t status = file.ForEachChunk(
         [&](const ChunkEntry& chunk) {
             if (!std::exchange(begun, true))
-                writer.begin(extent);
+                writer.begin(extent, containerWord(file.Info()));
             return writer.add(chunk);
         },
         &extent);
-    if (status != kStatusOK)
-        throw Failure(begun ? "a chunk header cannot be read" : "its container header cannot be read");
+    if (status != kStatusOK && !begun)
+        throw Failure("its container header cannot be read");
     if (!begun)
-        writer.begin(extent);
+        writer.begin(extent, containerWord(file.Info()));
+    const std::string error = status != kStatusOK ? "a chunk header cannot be read" : "";
+    writer.end(error);
+    return error;
 }
 
-bool runList(const std::vector<std::string>& files, const OutputOptions& options)
+bool runList(const FileArguments& files, const OutputOptions& options)
 {
     Output& output = Output::standard();
-    const bool several = files.size() > 1;
+    const bool several = files.maybeSeveral();
     const bool table = outputForm(options) == Form::table;
-    JsonRecords json(several ? JsonRecords::Shape::array : JsonRecords::Shape::single);
-    bool good = true;
-    for (const std::string& path : files) {
-        const bool first = &path == &files.front();
-        output.write(table && !first ? "\n" : "");
-        ChunkListWriter writer(options, json, path, several);
-        std::string error;
-        if (!reportingFailures(path, [&] {
-                try {
-                    listFile(path, writer, options.quiet);
-                } catch (const Failure& failure) {
-                    error = failure.what();
-                    throw;
-                }
-            }))
-            good = false;
-        writer.end(error);
-        if (output.failed())
-            break;
-    }
-    if (options.json)
+    JsonRecords json(options);
+    bool isFirst = true, isWhole = true;
+    const bool good = forEachFile(
+        files, options,
+        [&](const FoundFile& file) {
+            const bool follows = table && !isFirst;
+            ChunkListWriter writer(options, json, file.path, several, follows);
+            const std::string error = listFile(file.path, writer, options.quiet);
+            isFirst = false;
+            if (!error.empty()) {
+                isWhole = false;
+                output.flush();
+                reportFailure(file.path, error);
+            }
+        },
+        [&](const std::string& path, const std::string& text) {
+            if (options.wantsJson())
+                json.addFailure(path, text);
+        });
+    if (options.wantsJson())
         json.finish();
-    return good;
+    return good && isWhole;
 }
 
 void declareChunks(CommandLine& commandLine)
 {
-    static std::vector<std::string> files;
-    Verb& verb =
-        commandLine.addVerb("chunks", "List the chunks of audio files; get, add or remove one", [&commandLine] {
-            if (files.empty())
-                throw MissingArgument("FILE");
-            return runList(files, commandLine.output());
-        });
+    static FileArguments files;
+    Verb& verb = commandLine.addVerb("chunks", "List the chunks of audio files; get, add or remove one",
+                                     [&commandLine] { return runList(files, commandLine.output()); });
     CommandLine::addFiles(verb, files);
     declareChunksGet(commandLine, verb);
     declareChunkEdits(commandLine, verb);

@@ -7,7 +7,7 @@
 #include "tool/shared/edits/EditProblems.h"
 #include "tool/shared/input/InputFile.h"
 #include "tool/shared/output/Failure.h"
-#include "tool/shared/output/JsonWriter.h"
+#include "tool/shared/output/JsonRecords.h"
 
 #include <cerrno>
 #include <fcntl.h>
@@ -71,22 +71,21 @@ struct EditReport {
 void print(const EditArguments& arguments, const OutputOptions& output, const EditReport& report)
 {
     const bool adds = report.action == std::string_view("add");
-    if (output.json) {
-        JsonWriter json(Output::standard());
-        json.beginObject();
-        json.member("path", arguments.file);
-        json.member("action", report.action);
-        json.member("id", fourCCText(arguments.id));
-        json.member("count", report.count);
-        json.member("size", report.size);
-        if (adds)
-            json.member("replaced", report.replaced);
-        json.member("dryRun", arguments.options.dryRun);
-        if (!report.where.empty())
-            json.member("where", report.where);
-        if (!report.backup.empty())
-            json.member("backup", report.backup);
-        json.endObject().endLine();
+    if (output.wantsJson()) {
+        writeRecord(output, [&](JsonWriter& json) {
+            json.beginObject();
+            json.member("path", arguments.file);
+            json.member("action", report.action);
+            json.member("id", fourCCText(arguments.id));
+            json.member("count", report.count);
+            if (report.size >= 0)
+                json.member("size", report.size);
+            if (adds)
+                json.member("replaced", report.replaced);
+            json.member("dryRun", arguments.options.dryRun);
+            json.knownMember("where", report.where).knownMember("backup", report.backup);
+            json.endObject();
+        });
     } else if (!output.quiet) {
         const std::string what = report.count == 1 ? "chunk" : fmt::format("{} chunks", report.count);
         const char* const verb =
@@ -208,7 +207,8 @@ Verb& declareEdit(CommandLine& commandLine, Verb& chunks, const std::string& nam
         name, description,
         [&commandLine, &arguments, edit] {
             arguments.options.quiet = commandLine.output().quiet;
-            return reportingFailures(arguments.file, [&] { edit(arguments, commandLine.output()); });
+            return reportingRecord(arguments.file, commandLine.output(),
+                                   [&] { edit(arguments, commandLine.output()); });
         },
         &chunks);
     CommandLine::addFile(verb, arguments.file).required();

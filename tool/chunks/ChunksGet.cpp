@@ -7,7 +7,7 @@
 #include "tool/shared/input/ChunkBody.h"
 #include "tool/shared/input/InputFile.h"
 #include "tool/shared/output/Failure.h"
-#include "tool/shared/output/JsonWriter.h"
+#include "tool/shared/output/JsonRecords.h"
 #include "tool/shared/output/Progress.h"
 #include "tool/shared/output/UnseenCharacters.h"
 
@@ -76,15 +76,11 @@ void getFromAnywhere(const GetArguments& arguments, const OutputOptions& options
 {
     const SidecarChunk chunk = readFromAnywhere(arguments.file, arguments.id, arguments.sidecar);
     put([&](const Sink& sink) { sink(textOf(chunk.body)); }, arguments);
-    if (options.json)
-        JsonWriter(Output::standard())
-            .beginObject()
-            .member("path", arguments.file)
-            .member("id", fourCCText(arguments.id))
-            .member("source", chunk.source)
-            .member("size", chunk.body.size())
-            .endObject()
-            .endLine();
+    if (options.wantsJson())
+        writeRecord(options, [&](JsonWriter& json) {
+            json.beginObject().member("path", arguments.file).member("id", fourCCText(arguments.id));
+            json.member("source", chunk.source).member("size", chunk.body.size()).endObject();
+        });
 }
 
 void getChunk(const GetArguments& arguments, const OutputOptions& options)
@@ -95,17 +91,12 @@ void getChunk(const GetArguments& arguments, const OutputOptions& options)
     CAudioFileIO file;
     openChunks(file, arguments.file);
     const ChunkBody chunk = requireChunk(file, arguments.id);
-    const std::string id = fourCCText(arguments.id);
     put([&](const Sink& sink) { copyBody(file, chunk.offset, chunk.size, options.quiet, sink); }, arguments);
-    if (options.json)
-        JsonWriter(Output::standard())
-            .beginObject()
-            .member("path", arguments.file)
-            .member("id", id)
-            .member("offset", chunk.header)
-            .member("size", chunk.size)
-            .endObject()
-            .endLine();
+    if (options.wantsJson())
+        writeRecord(options, [&](JsonWriter& json) {
+            json.beginObject().member("path", arguments.file).member("id", fourCCText(arguments.id));
+            json.member("offset", chunk.header).member("size", chunk.size).endObject();
+        });
 }
 
 } // namespace
@@ -116,9 +107,10 @@ void declareChunksGet(CommandLine& commandLine, Verb& chunks)
     Verb& verb = commandLine.addVerb(
         "get", "Write a chunk's body to standard output or a file; of several chunks of the id, the last",
         [&commandLine] {
-            if (commandLine.output().json && (arguments.out.empty() || arguments.out == "-"))
+            if (commandLine.output().wantsJson() && (arguments.out.empty() || arguments.out == "-"))
                 throw UsageError("--json needs -o OUT, since the chunk itself goes to standard output");
-            return reportingFailures(arguments.file, [&] { getChunk(arguments, commandLine.output()); });
+            return reportingRecord(arguments.file, commandLine.output(),
+                                   [&] { getChunk(arguments, commandLine.output()); });
         },
         &chunks);
     CommandLine::addFile(verb, arguments.file).required();

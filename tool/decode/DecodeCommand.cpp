@@ -4,6 +4,7 @@
 #include "tool/shared/arguments/CommandLine.h"
 #include "tool/shared/arguments/SoundRange.h"
 #include "tool/shared/input/FileByFile.h"
+#include "tool/shared/input/InputFile.h"
 
 #include <array>
 #include <unistd.h>
@@ -21,7 +22,7 @@ constexpr std::array<NamedDepth, 4> kDepths{
     {{"16", {16, false}}, {"24", {24, false}}, {"32", {32, false}}, {"f32", {32, true}}}};
 
 struct DecodeArguments {
-    std::vector<std::string> files;
+    FileArguments files;
     std::string out;
     DecodeOptions options;
 };
@@ -51,19 +52,24 @@ bool runDecode(DecodeArguments& arguments, OutputOptions output)
     arguments.options.wishes.format = &formatFor(arguments);
     arguments.options.quiet = output.quiet;
     requireOrder(arguments.options.wishes.start, arguments.options.wishes.end);
-    const std::vector<DecodeJob> jobs = decodeJobs(arguments.files, arguments.out, *arguments.options.wishes.format);
     const bool toOutput = arguments.out == "-";
-    if (toOutput && output.json)
-        throw UsageError("--json and the sound cannot both go to standard output");
+    if (toOutput && output.wantsJson())
+        throw UsageError("JSON and the sound cannot both go to standard output");
     if (toOutput && isTerminal(STDOUT_FILENO))
         throw UsageError("sound does not go to a terminal: name a file");
-    std::optional<DecodeFolder> folder;
-    if (!reportingFailures(arguments.out, [&] { folder.emplace(arguments.out); }))
+    if (!arguments.out.empty() && !isDecodeFolder(arguments.out) && arguments.files.maybeSeveral())
+        throw UsageError(toOutput ? "one file at a time goes to standard output"
+                                  : "of several files the output is a folder: \"" + printable(arguments.out) +
+                                        "\" is none; one to be made ends with \"/\"");
+    std::vector<std::string> names;
+    if (!reportingRecord(arguments.files.listName(), output, [&] { names = allNames(arguments.files); }))
         return false;
-    DecodeReport report(toOutput ? Form::none : outputForm(output));
-    auto job = jobs.begin();
-    return writeFileByFile(report, arguments.files,
-                           [&](const std::string&) { return decodeFile(*job++, arguments.options); });
+    DecodeTargets targets(arguments.out, *arguments.options.wishes.format);
+    DecodeReport report(toOutput ? Form::none : outputForm(output), output);
+    return writeFileByFile(report, FoundFiles{names.front(), targets.plan(names)}, output, [&](const FoundFile& file) {
+        requireRegularFile(file.path); // ahead of making a folder for it
+        return decodeFile({file.path, targets.outputOf(file)}, arguments.options);
+    });
 }
 
 template <class Value>
@@ -108,7 +114,7 @@ void declareDecode(CommandLine& commandLine)
     static DecodeArguments arguments;
     Verb& verb = commandLine.addVerb("decode", "Decode audio files of any format to linear PCM",
                                      [&commandLine] { return runDecode(arguments, commandLine.output()); });
-    CommandLine::addFiles(verb, arguments.files).required();
+    CommandLine::addFiles(verb, arguments.files);
     CommandLine::addPath(verb, "-o,--output", arguments.out,
                          "The file or folder to write to, \"-\" for standard output; else the current folder")
         .label("OUT");

@@ -24,12 +24,14 @@ void writeJson(JsonWriter& json, const std::string& path, const DecodeResult& re
     json.beginObject();
     json.member("path", path);
     json.member("output", result.output);
-    json.member("format", result.container);
+    json.member("containerName", result.container);
     json.member("sampleRate", std::llround(sound.sampleRate));
-    json.member("channels", sound.channels);
-    json.member("bits", sound.depth.bits);
+    json.member("bitsPerSample", sound.depth.bits);
     json.member("floatingPoint", sound.depth.isFloat);
+    json.member("channels", sound.channels);
     json.member("frames", sound.frames);
+    if (sound.sampleRate > 0)
+        json.member("durationSeconds", static_cast<double>(sound.frames) / sound.sampleRate);
     json.member("clippedSamples", result.clippedSamples);
     json.member("missingFrames", result.missingFrames);
     json.member("tags", result.tags.keys);
@@ -42,9 +44,10 @@ void writeJson(JsonWriter& json, const std::string& path, const DecodeResult& re
 
 void DecodeReport::add(const std::string& path, const DecodeResult& result)
 {
-    if (form_ == Form::json)
-        writeJson(json_.next(), path, result);
-    else if (form_ != Form::none)
+    if (form_ == Form::json) {
+        writeJson(json_.begin(), path, result);
+        json_.end();
+    } else if (form_ != Form::none)
         output_.print("{}: decoded to {}, {}{}\n", printable(path), printable(result.output), soundText(result),
                       result.tags.keys.empty() ? "" : ", with its tags");
     if (form_ == Form::table)

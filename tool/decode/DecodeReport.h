@@ -9,7 +9,7 @@
 /// A writer for writeFileByFile.
 class DecodeReport {
 public:
-    explicit DecodeReport(Form form) : form_(form) {}
+    DecodeReport(Form form, const OutputOptions& options) : form_(form), json_(options) {}
 
     void add(const std::string& path, const DecodeResult& result);
     void addFailure(const std::string& path, const std::string& text);

@@ -53,7 +53,8 @@ void DecodeSource::open(const std::string& path)
     platform::Error error;
     reader_ = ConvertingReader::open(*coordinatedURL(path), &status, &error);
     if (!reader_)
-        throw Failure(std::filesystem::file_size(path) == 0 ? "is empty" : error.description);
+        throw OtherKind(std::filesystem::file_size(path) == 0 ? "is empty" : error.description,
+                        OtherKind::Kind::unknown);
     reader_->compareChecksum();
     sourceRate_ = reader_->clientFormat().sampleRate;
 }

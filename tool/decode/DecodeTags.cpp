@@ -108,7 +108,7 @@ DecodeTags::DecodeTags(const std::string& path)
     bool holdsTags = true;
     try {
         source_ = readLoopSource(path);
-    } catch (const NoLoopContainer&) {
+    } catch (const OtherKind&) {
         holdsTags = false;
     } catch (const Failure& failure) { // no reason to go without the sound
         problem_ = failure.what();

@@ -1,75 +1,113 @@
 #include "tool/decode/DecodeTargets.h"
 
 #include "files/AudioFileNames.h"
-#include "tool/shared/arguments/UsageError.h"
+#include "tool/shared/input/FolderWalk.h"
 #include "tool/shared/output/Failure.h"
-#include "tool/shared/output/Terminal.h"
 
 #include <fmt/format.h>
 
 #include <cerrno>
 #include <cstring>
-#include <filesystem>
 #include <map>
+#include <ranges>
 #include <sys/stat.h>
 #include <unistd.h>
 
 namespace {
 
 // By the suite's rule of what an extension is: the number of a take is none.
-std::string outputIn(const std::filesystem::path& folder, const std::string& file, const DecodeFormat& format)
+std::string outputName(const std::string& name, const DecodeFormat& format)
 {
-    const std::string name = std::filesystem::path(file).filename().string();
     std::string stem = name;
     CFileUtilCutExtension(stem.data(), nullptr);
     stem.resize(std::strlen(stem.c_str()));
-    return (folder / fmt::format("{}.{}", stem.empty() ? name : stem, format.name)).string();
+    return fmt::format("{}.{}", stem.empty() ? name : stem, format.name);
 }
 
-void refuseSharedOutputs(const std::vector<DecodeJob>& jobs)
+std::string resolvedFolder(const std::string& folder)
 {
-    std::map<std::string, const DecodeJob*> byOutput;
-    for (const DecodeJob& job : jobs)
-        if (const auto [other, isFirst] = byOutput.try_emplace(job.output, &job); !isFirst)
-            throw UsageError(fmt::format("{} and {} would both be decoded to {}", printable(other->second->file),
-                                         printable(job.file), printable(job.output)));
+    std::error_code error;
+    const std::string path = std::filesystem::canonical(folder, error).string();
+    return error ? "" : path + "/";
 }
 
 } // namespace
 
 bool isDecodeFolder(const std::string& out)
 {
-    std::error_code error;
-    return out.ends_with('/') || std::filesystem::is_directory(out, error);
+    return out.ends_with('/') || isFolder(out);
 }
 
-std::vector<DecodeJob> decodeJobs(const std::vector<std::string>& files, const std::string& out,
-                                  const DecodeFormat& format)
+DecodeTargets::DecodeTargets(const std::string& out, const DecodeFormat& format)
+    : out_(out),
+      format_(format),
+      toFolder_(out.empty() || isDecodeFolder(out))
 {
-    const bool toFolder = out.empty() || isDecodeFolder(out);
-    if (files.size() > 1 && !toFolder)
-        throw UsageError(out == "-" ? "one file at a time goes to standard output"
-                                    : "of several files the output is a folder: \"" + printable(out) +
-                                          "\" is none; one to be made ends with \"/\"");
-    std::vector<DecodeJob> jobs;
-    for (const std::string& file : files)
-        jobs.push_back({file, toFolder ? outputIn(out, file, format) : out});
-    refuseSharedOutputs(jobs);
-    return jobs;
 }
 
-DecodeFolder::DecodeFolder(const std::string& out)
+DecodeTargets::~DecodeTargets()
 {
-    if (!out.ends_with('/'))
+    for (const std::string& folder : std::views::reverse(made_))
+        ::rmdir(folder.c_str());
+}
+
+std::string DecodeTargets::nameOf(const FoundFile& file) const
+{
+    if (!toFolder_)
+        return out_;
+    const std::filesystem::path below = file.path.substr(file.folderLength); // may begin with a slash
+    const std::filesystem::path folder = file.isBelowFolder() ? below.relative_path().parent_path() : "";
+    return (out_ / folder / outputName(below.filename().string(), format_)).string();
+}
+
+bool DecodeTargets::isEarlierOutput(const FoundFile& file) const
+{
+    if (!file.isBelowFolder() || out_.empty())
+        return false;
+    static const std::string outputs = resolvedFolder(out_);
+    return !outputs.empty() && resolvedFolder(std::filesystem::path(file.path).parent_path()).starts_with(outputs);
+}
+
+std::vector<FoundFile> DecodeTargets::plan(const std::vector<std::string>& names)
+{
+    std::vector<FoundFile> files;
+    std::map<std::string, std::string> sources;
+    FolderWalk walk(names, [&](FoundFile file) {
+        if (isEarlierOutput(file))
+            return true;
+        // What only lies beside the sound, such as a picture, is passed over when its turn comes.
+        if (toFolder_ && file.problem.empty() && (!file.isBelowFolder() || isCalledAudio(file.path))) {
+            const std::string output = nameOf(file);
+            if (const auto [other, isFirst] = sources.try_emplace(output, file.path); !isFirst) {
+                shared_.insert({other->second, file.path});
+                reportFailure(file.path,
+                              fmt::format("{} would be decoded to {} too; neither is", other->second, output));
+            }
+        }
+        files.push_back(std::move(file));
+        return true;
+    });
+    walk.run();
+    return files;
+}
+
+std::string DecodeTargets::outputOf(const FoundFile& file)
+{
+    std::string output = nameOf(file);
+    if (shared_.contains(file.path))
+        throw ToldFailure(fmt::format("is not the only file that would be decoded to {}", output));
+    if (toFolder_)
+        makeFolder(std::filesystem::path(output).parent_path());
+    return output;
+}
+
+void DecodeTargets::makeFolder(const std::filesystem::path& folder)
+{
+    if (folder.empty() || isFolder(folder))
         return;
-    if (::mkdir(out.c_str(), 0777) == 0)
-        made_ = out;
+    makeFolder(folder.parent_path());
+    if (::mkdir(folder.c_str(), 0777) == 0)
+        made_.push_back(folder);
     else if (errno != EEXIST)
-        throw Failure(systemErrorText(errno));
-}
-
-DecodeFolder::~DecodeFolder()
-{
-    if (!made_.empty())
-        ::rmdir(made_.c_str());
+        throw Failure("the folder " + folder.string() + ": " + systemErrorText(errno));
 }

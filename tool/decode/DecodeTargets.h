@@ -1,29 +1,43 @@
 // Where the outputs of `ktfiles decode` go.
 #pragma once
 
-#include "tool/decode/DecodeFile.h"
+#include "tool/decode/DecodeFormat.h"
+#include "tool/shared/input/FoundFile.h"
 
+#include <filesystem>
+#include <set>
 #include <string>
 #include <vector>
 
-/// A job for each file. `out` is empty (the current folder), "-", a folder, or the file to write; a folder is one that
-/// is there or ends with "/", and its files are called as what they come from, with the extension of the format. Throws
-/// UsageError for several files to one output.
-std::vector<DecodeJob> decodeJobs(const std::vector<std::string>& files, const std::string& out,
-                                  const DecodeFormat& format);
-
-/// Whether `out` names a folder, and not a file.
+/// Whether `out` names a folder, and not a file: it is one, or ends with "/".
 bool isDecodeFolder(const std::string& out);
 
-/// The folder of the outputs, made where it is missing, and gone again when nothing came to be in it.
-class DecodeFolder {
+/// The outputs of many files: which they are, and the folders that they are in, made where they are missing and gone
+/// again when nothing came to be in them.
+class DecodeTargets {
 public:
-    /// Throws Failure.
-    explicit DecodeFolder(const std::string& out);
-    ~DecodeFolder();
-    DecodeFolder(const DecodeFolder&) = delete;
-    DecodeFolder& operator=(const DecodeFolder&) = delete;
+    /// `out` is empty (the current folder), "-", a folder, or the file to write. In a folder an output is called as
+    /// what it comes from, with the extension of the format, and the tree below a folder that was named is mirrored.
+    DecodeTargets(const std::string& out, const DecodeFormat& format);
+    ~DecodeTargets();
+    DecodeTargets(const DecodeTargets&) = delete;
+    DecodeTargets& operator=(const DecodeTargets&) = delete;
+
+    /// The files that these names lead to, without those in the output folder, where earlier outputs are. What would be
+    /// decoded to one output with another is told on standard error.
+    std::vector<FoundFile> plan(const std::vector<std::string>& names);
+
+    /// The output of one of them; its folder is there. Throws Failure.
+    std::string outputOf(const FoundFile& file);
 
 private:
-    std::string made_;
+    std::string nameOf(const FoundFile& file) const;
+    bool isEarlierOutput(const FoundFile& file) const;
+    void makeFolder(const std::filesystem::path& folder);
+
+    std::string out_;
+    const DecodeFormat& format_;
+    bool toFolder_;
+    std::set<std::string> shared_; // files that would be decoded to one output with others
+    std::vector<std::string> made_;
 };

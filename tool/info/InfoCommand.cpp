@@ -1,7 +1,7 @@
 // ktfiles info: what audio files are.
-#include "tool/info/CodingWords.h"
 #include "tool/shared/access/FileAccess.h"
 #include "tool/shared/arguments/CommandLine.h"
+#include "tool/shared/input/CodingWords.h"
 #include "tool/shared/input/FileByFile.h"
 #include "tool/shared/input/FileFacts.h"
 #include "tool/shared/input/InputFile.h"
@@ -34,13 +34,13 @@ AudioFileInfo describe(const std::string& path, bool quiet)
     AudioFileInfo info;
     const std::int32_t status = GetAudioFileInfo(file, 0, info);
     if (file.GetEOF() == 0)
-        throw Failure("is empty");
+        throw OtherKind("is empty", OtherKind::Kind::unknown);
     if (status == platform::AudioHandle::kFormatNotSupported)
         failAsDecoderDoes(path, containerWord(info));
     if (status == kStatusEndOfFile)
         throw Failure("ends within its header");
     if (status == kStatusParameterError || (status == kStatusOK && info.containerId == 0))
-        throw Failure("no audio file known here");
+        throw OtherKind("no audio file known here", OtherKind::Kind::unknown);
     requireOK(status);
     if (info.framesAreStated) { // by a header: the decoder, where there is one, counts
         CAudioFileIO audio;
@@ -108,39 +108,49 @@ std::string typeByNameText(const FileFacts& facts)
     return facts.typeByName != 0 ? fourCCText(facts.typeByName) : "";
 }
 
-void writeJson(JsonWriter& json, const std::string& path, const AudioFileInfo& info, const FileFacts& facts)
+template <class Number>
+std::optional<Number> positive(Number number)
 {
+    return number > 0 ? std::optional(number) : std::nullopt;
+}
+
+/// What is known of a file.
+struct Description {
+    AudioFileInfo info;
+    FileFacts facts;
+};
+
+void writeJson(JsonWriter& json, const std::string& path, const Description& description)
+{
+    const auto& [info, facts] = description;
     json.beginObject();
     json.member("path", path);
     json.member("container", fourCCText(info.containerId));
+    json.member("containerName", containerWord(info));
     json.member("fileType", fourCCText(info.fileType));
     json.member("formatCode", fourCCText(info.formatCode));
-    json.member("sampleRate", info.sampleRate);
     json.member("coding", codingWord(info));
-    json.member("bitsPerSample", info.bitsPerSample);
-    if (info.sourceBits > 0)
-        json.member("sourceBits", info.sourceBits);
-    if (const std::int64_t rate = bitRateOf(info); rate > 0)
-        json.member("bitRate", rate);
-    if (info.dsdRate > 0)
-        json.member("dsdRate", info.dsdRate);
+    json.knownMember("sampleRate", positive(info.sampleRate));
+    json.knownMember("bitsPerSample", positive(info.bitsPerSample));
+    json.knownMember("sourceBits", positive(info.sourceBits));
+    if (!info.compressed)
+        json.member("floatingPoint", info.floatingPoint);
+    json.knownMember("bitRate", positive(bitRateOf(info)));
+    json.knownMember("dsdRate", positive(info.dsdRate));
     json.member("channels", info.channels);
-    if (const std::string layout = layoutWord(info); !layout.empty())
-        json.member("channelLayout", layout);
+    json.knownMember("channelLayout", layoutWord(info));
     if (info.audioTracks > 1)
         json.member("audioTracks", info.audioTracks);
-    json.member("floatingPoint", info.floatingPoint);
     json.member("frames", info.frames);
-    json.member("durationSeconds", durationOf(info));
+    if (info.exactSampleRate > 0)
+        json.member("durationSeconds", durationOf(info));
     json.member("isWhole", info.IsWhole());
-    if (info.missingDataSize > 0)
-        json.member("missingBytes", info.missingDataSize);
-    if (const std::int64_t frames = promisedFrames(info); frames > 0)
-        json.member("promisedFrames", frames);
-    json.member("dataOffset", info.dataOffset);
+    json.knownMember("missingBytes", positive(info.missingDataSize));
+    json.knownMember("promisedFrames", positive(promisedFrames(info)));
+    json.knownMember("dataOffset", positive(info.dataOffset));
     json.member("fileLength", info.fileLength);
-    json.member("typeByName", typeByNameText(facts));
-    json.member("modified", dateText(facts.modified));
+    json.knownMember("typeByName", typeByNameText(facts));
+    json.knownMember("modified", dateText(facts.modified));
     if (info.framesAreStated)
         json.member("framesAreStated", true); // no decoder could count them
     if (facts.stereo) {
@@ -165,19 +175,23 @@ public:
     InfoWriter(const OutputOptions& options, bool isLong)
         : form_(outputForm(options)),
           color_(usesColor(options.color)),
-          isLong_(isLong)
+          isLong_(isLong),
+          json_(options)
     {
     }
 
-    void add(const std::string& path, const AudioFileInfo& info)
+    bool needsFacts() const { return form_ == Form::json || isLong_; }
+
+    void add(const std::string& path, const Description& description)
     {
-        const FileFacts facts = form_ == Form::json || isLong_ ? factsOf(path) : FileFacts();
-        if (form_ == Form::json)
-            writeJson(json_.next(), path, info, facts);
-        else if (form_ == Form::table)
-            addRow(path, info, facts);
-        else if (form_ == Form::lines)
-            addLine(path, info, facts);
+        if (form_ == Form::json) {
+            writeJson(json_.begin(), path, description);
+            json_.end();
+        } else if (form_ == Form::table) {
+            addRow(path, description);
+        } else if (form_ == Form::lines) {
+            addLine(path, description);
+        }
     }
 
     void addFailure(const std::string& path, const std::string& text)
@@ -194,8 +208,9 @@ public:
     }
 
 private:
-    void addRow(const std::string& path, const AudioFileInfo& info, const FileFacts& facts)
+    void addRow(const std::string& path, const Description& description)
     {
+        const auto& [info, facts] = description;
         std::vector<std::string> row{printable(path),   containerWord(info),
                                      lengthText(info),  rateText(info),
                                      formatWords(info), channelsText(info) + (isLong_ ? tracksText(info) : "")};
@@ -208,8 +223,9 @@ private:
         table_.add(std::move(row));
     }
 
-    void addLine(const std::string& path, const AudioFileInfo& info, const FileFacts& facts)
+    void addLine(const std::string& path, const Description& description)
     {
+        const auto& [info, facts] = description;
         output_.print("{}\t{}\t{:.6f}\t{}\t{}\t{}", printable(path), containerWord(info), durationOf(info),
                       info.sampleRate, formatWords(info), info.channels);
         if (isLong_)
@@ -229,19 +245,21 @@ private:
     Table table_{columns(isLong_)};
 };
 
-bool runInfo(const std::vector<std::string>& files, bool isLong, const OutputOptions& options)
+bool runInfo(const FileArguments& files, bool isLong, const OutputOptions& options)
 {
     InfoWriter writer(options, isLong);
-    return writeFileByFile(writer, files, [&](const std::string& path) { return describe(path, options.quiet); });
+    return writeFileByFile(writer, files, options, [&](const FoundFile& file) {
+        return Description{describe(file.path, options.quiet), writer.needsFacts() ? factsOf(file.path) : FileFacts()};
+    });
 }
 
 void declareInfo(CommandLine& commandLine)
 {
-    static std::vector<std::string> files;
+    static FileArguments files;
     static bool isLong = false;
     Verb& verb = commandLine.addVerb("info", "Say what audio files are: length, rate, format, channels",
                                      [&commandLine] { return runInfo(files, isLong, commandLine.output()); });
-    CommandLine::addFiles(verb, files).required();
+    CommandLine::addFiles(verb, files);
     verb.addFlag("-l,--long", isLong,
                  "Also the number of tracks, the type by the name, the date of modification and the stereo partner");
 }

@@ -9,7 +9,7 @@
 #include "tool/shared/arguments/CommandLine.h"
 #include "tool/shared/arguments/TimeoutOption.h"
 #include "tool/shared/output/Failure.h"
-#include "tool/shared/output/JsonWriter.h"
+#include "tool/shared/output/JsonRecords.h"
 
 #include <algorithm>
 #include <array>
@@ -134,13 +134,10 @@ void sayHeld(const LockArguments& arguments, const OutputOptions& options)
     Output& output = Output::standard();
     switch (outputForm(options)) {
     case Form::json:
-        JsonWriter(output)
-            .beginObject()
-            .member("path", arguments.file)
-            .member("lock", arguments.kind())
-            .member("held", true)
-            .endObject()
-            .endLine();
+        writeRecord(options, [&](JsonWriter& json) {
+            json.beginObject().member("path", arguments.file).member("lock", arguments.kind());
+            json.member("held", true).endObject();
+        });
         break;
     case Form::table:
         output.print("{}: {} lock held; end of input{} releases it\n", printable(arguments.file), arguments.kind(),
@@ -191,7 +188,8 @@ bool runLock(LockArguments& arguments, CommandLine& commandLine)
     if (arguments.read + arguments.write + arguments.presenter > 1)
         throw UsageError("--read, --write and --presenter exclude each other");
     int status = kExitFailed;
-    reportingFailures(arguments.file, [&] { status = lockAndRun(arguments, commandLine.output()); });
+    reportingRecord(arguments.file, commandLine.output(),
+                    [&] { status = lockAndRun(arguments, commandLine.output()); });
     commandLine.setFailureStatus(status);
     return status == kExitOK;
 }

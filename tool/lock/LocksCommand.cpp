@@ -25,7 +25,10 @@ const char* roleText(CoordinationParty::Role role)
 
 class PartiesWriter {
 public:
-    explicit PartiesWriter(const OutputOptions& options) : form_(outputForm(options)), color_(usesColor(options.color))
+    explicit PartiesWriter(const OutputOptions& options)
+        : form_(outputForm(options)),
+          color_(usesColor(options.color)),
+          json_(options)
     {
     }
 
@@ -36,20 +39,17 @@ public:
         const char* const role = roleText(party.role);
         const char* const access = party.isWriting ? "write" : "read";
         const std::string item = path.empty() ? fmt::format("item:{:012x}", party.itemNumber) : printable(path);
-        if (form_ == Form::json)
-            json_.next()
-                .beginObject()
-                .member("path", path.empty() ? std::nullopt : std::optional(path))
-                .member("item", party.itemNumber)
-                .member("role", role)
-                .member("access", access)
-                .member("processID", party.processID)
-                .member("command", name)
-                .endObject();
-        else if (form_ == Form::table)
+        if (form_ == Form::json) {
+            JsonWriter& json = json_.begin();
+            json.beginObject().knownMember("path", path).member("item", party.itemNumber).member("role", role);
+            json.member("access", access).member("processID", party.processID).knownMember("command", name);
+            json.endObject();
+            json_.end();
+        } else if (form_ == Form::table) {
             table_.add({item, role, access, std::to_string(party.processID), printable(name)});
-        else if (form_ == Form::lines)
+        } else if (form_ == Form::lines) {
             output_.print("{}\t{}\t{}\t{}\t{}\n", item, role, access, party.processID, printable(name));
+        }
     }
 
     void addFailure(const std::string& path, const std::string& text)

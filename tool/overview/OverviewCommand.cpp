@@ -7,6 +7,7 @@
 #include "tool/shared/arguments/CommandLine.h"
 #include "tool/shared/arguments/SoundRange.h"
 #include "tool/shared/edits/OutputFile.h"
+#include "tool/shared/input/FileByFile.h"
 #include "tool/shared/output/ClockTime.h"
 #include "tool/shared/output/Failure.h"
 
@@ -19,7 +20,7 @@ constexpr std::pair kWidths{16, 16384};
 constexpr std::pair kHeights{8, 4096};
 
 struct OverviewArguments {
-    std::vector<std::string> files;
+    FileArguments files;
     std::string png, svg;
     PictureSettings picture;
     SoundLength start;
@@ -106,7 +107,7 @@ void workOn(const std::string& path, const OverviewArguments& arguments, Overvie
 void requireSense(const OverviewArguments& arguments, const Verb& verb, const OutputOptions& output)
 {
     const auto given = [&verb](const char* option) { return verb.isGiven(option); };
-    if (arguments.draws() && arguments.files.size() > 1)
+    if (arguments.draws() && arguments.files.maybeSeveral())
         throw UsageError("--png and --svg draw one file at a time");
     if (!arguments.draws())
         for (const char* const option :
@@ -123,8 +124,8 @@ void requireSense(const OverviewArguments& arguments, const Verb& verb, const Ou
     if (arguments.draws() && arguments.png == arguments.svg)
         throw UsageError("--png and --svg name the same file");
     const bool toOutput = arguments.png == "-" || arguments.svg == "-";
-    if (toOutput && output.json)
-        throw UsageError("--json and a picture cannot both go to standard output");
+    if (toOutput && output.wantsJson())
+        throw UsageError("JSON and a picture cannot both go to standard output");
     if (arguments.png == "-" && isTerminal(STDOUT_FILENO))
         throw UsageError("a PNG does not go to a terminal: name a file");
 }
@@ -133,21 +134,13 @@ bool runOverview(OverviewArguments& arguments, const Verb& verb, OutputOptions o
 {
     requireSense(arguments, verb, output);
     arguments.edit.quiet = output.quiet;
+    arguments.files.takesFolders = !arguments.store;
     if (arguments.png == "-" || arguments.svg == "-") // nothing but the picture
         output.quiet = true;
     OverviewReport report(output, arguments.files);
-    bool good = true;
-    for (const std::string& path : arguments.files) {
-        if (Output::standard().failed())
-            break;
-        try {
-            workOn(path, arguments, report);
-        } catch (const Failure& failure) {
-            good = false;
-            report.addFailure(path, failure.what());
-            reportFailure(path, failure.what());
-        }
-    }
+    const bool good = forEachFile(
+        arguments.files, output, [&](const FoundFile& file) { workOn(file.path, arguments, report); },
+        [&](const std::string& path, const std::string& text) { report.addFailure(path, text); });
     report.finish();
     return good;
 }
@@ -188,7 +181,7 @@ void declareOverview(CommandLine& commandLine)
     static Verb* verb = nullptr;
     verb = &commandLine.addVerb("overview", "Show waveforms: in the terminal, as numbers, as a PNG or SVG; store them",
                                 [&commandLine] { return runOverview(arguments, *verb, commandLine.output()); });
-    CommandLine::addFiles(*verb, arguments.files).required();
+    CommandLine::addFiles(*verb, arguments.files);
     addPictureOptions(*verb, arguments);
     verb->addFlag("--stored", arguments.fromStored, "Take the overview that is stored in the file, not the sound");
     verb->addFlag("--store", arguments.store, "Store the overview in the file");

@@ -1,6 +1,7 @@
 #include "tool/overview/OverviewReport.h"
 
 #include "tool/overview/Sparkline.h"
+#include "tool/shared/input/FolderWalk.h"
 #include "tool/shared/output/ClockTime.h"
 #include "tool/shared/output/Terminal.h"
 
@@ -58,22 +59,24 @@ std::string storeText(const StoreResult& store, bool dryRun, std::size_t points)
 
 } // namespace
 
-OverviewReport::OverviewReport(const OutputOptions& options, const std::vector<std::string>& files)
+OverviewReport::OverviewReport(const OutputOptions& options, const FileArguments& files)
     : form_(outputForm(options)),
       color_(usesColor(options.color)),
       columns_(terminalColumns()),
-      json_(files.size() > 1 ? JsonRecords::Shape::array : JsonRecords::Shape::single)
+      json_(options)
 {
-    for (const std::string& path : files)
+    const int most = std::max(columns_ / 3, 8);
+    for (const std::string& path : files.names)
         nameWidth_ = std::max(nameWidth_, displayWidth(printable(path)));
-    nameWidth_ = std::min(nameWidth_, std::max(columns_ / 3, 8));
+    const bool areKnown = files.list.empty() && std::ranges::none_of(files.names, isFolder);
+    nameWidth_ = areKnown ? std::min(nameWidth_, most) : most;
 }
 
 void OverviewReport::add(const std::string& path, const FileOverview& overview, const OverviewDeeds& deeds)
 {
     const Waveform waveform = overview.waveform();
     if (form_ == Form::json) {
-        addJson(path, waveform, deeds);
+        addJson(path, overview, waveform, deeds);
     } else if (form_ != Form::none && deeds.any()) {
         addDeeds(path, waveform, deeds);
     } else if (form_ == Form::table) {
@@ -106,26 +109,25 @@ void OverviewReport::addDeeds(const std::string& path, const Waveform& waveform,
                       deeds.store->backup.empty() ? "" : "; backup " + printable(deeds.store->backup));
 }
 
-void OverviewReport::addJson(const std::string& path, const Waveform& waveform, const OverviewDeeds& deeds)
+void OverviewReport::addJson(const std::string& path, const FileOverview& overview, const Waveform& waveform,
+                             const OverviewDeeds& deeds)
 {
-    JsonWriter& json = json_.next();
+    JsonWriter& json = json_.begin();
     json.beginObject();
-    json.member("path", path).member("frames", waveform.frames).member("framesPerPoint", kOverviewFramesPerPoint);
+    json.member("path", path).member("sampleRate", overview.info().sampleRate);
+    json.member("channels", overview.info().channels).member("frames", waveform.frames);
+    json.member("durationSeconds", waveform.seconds()).member("framesPerPoint", kOverviewFramesPerPoint);
     json.key("points").beginArray();
     for (const OverviewPoint& point : waveform.points)
         json.beginArray().write(point.minimum).write(point.maximum).endArray();
     json.endArray();
-    if (!deeds.png.empty())
-        json.member("png", deeds.png);
-    if (!deeds.svg.empty())
-        json.member("svg", deeds.svg);
+    json.knownMember("png", deeds.png).knownMember("svg", deeds.svg);
     if (deeds.store) {
         json.member("stored", deeds.store->stored).member("changed", deeds.store->changed);
-        json.member("dryRun", deeds.dryRun);
-        if (!deeds.store->backup.empty())
-            json.member("backup", deeds.store->backup);
+        json.member("dryRun", deeds.dryRun).knownMember("backup", deeds.store->backup);
     }
     json.endObject();
+    json_.end();
 }
 
 void OverviewReport::addFailure(const std::string& path, const std::string& text)

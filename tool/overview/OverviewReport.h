@@ -3,6 +3,7 @@
 
 #include "tool/overview/FileOverview.h"
 #include "tool/overview/OverviewStore.h"
+#include "tool/shared/input/FileArguments.h"
 #include "tool/shared/output/JsonRecords.h"
 
 #include <optional>
@@ -21,8 +22,8 @@ struct OverviewDeeds {
 
 class OverviewReport {
 public:
-    /// All files that will come, for the width of the names.
-    OverviewReport(const OutputOptions& options, const std::vector<std::string>& files);
+    /// The files that will come are for the width of the names.
+    OverviewReport(const OutputOptions& options, const FileArguments& files);
 
     void add(const std::string& path, const FileOverview& overview, const OverviewDeeds& deeds);
     void addFailure(const std::string& path, const std::string& text);
@@ -31,7 +32,8 @@ public:
 private:
     void addSparkline(const std::string& path, const Waveform& waveform);
     void addDeeds(const std::string& path, const Waveform& waveform, const OverviewDeeds& deeds);
-    void addJson(const std::string& path, const Waveform& waveform, const OverviewDeeds& deeds);
+    void addJson(const std::string& path, const FileOverview& overview, const Waveform& waveform,
+                 const OverviewDeeds& deeds);
 
     Form form_;
     bool color_;

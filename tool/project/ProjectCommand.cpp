@@ -24,17 +24,7 @@ bool runOn(const std::string& path, const OutputOptions& output, const std::func
     if (path.empty())
         throw MissingArgument("PACKAGE");
     platform::setApplicationInfo({"ktfiles", KTFILES_VERSION});
-    return reportingFailures(path, [&] {
-        try {
-            work();
-        } catch (const Failure& failure) {
-            if (JsonRecords json(JsonRecords::Shape::single); output.json) {
-                json.addFailure(path, failure.what());
-                json.finish();
-            }
-            throw;
-        }
-    });
+    return reportingRecord(path, output, work);
 }
 
 void backUp(const ProjectArguments& arguments, const OutputOptions& output)

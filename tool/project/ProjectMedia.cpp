@@ -2,7 +2,7 @@
 
 #include "tool/project/ProjectPackage.h"
 #include "tool/shared/output/Failure.h"
-#include "tool/shared/output/JsonWriter.h"
+#include "tool/shared/output/JsonRecords.h"
 #include "tool/shared/output/Table.h"
 
 #include <algorithm>
@@ -53,20 +53,16 @@ void printProjectMedia(const std::string& path, ProjectInformation& project, std
             const bool exists = isThere(file);
             if (exists && onlyMissing)
                 continue;
-            if (options.json)
+            if (options.wantsJson())
                 media.beginObject().member("key", list.key).member("file", file).member("exists", exists).endObject();
             else
                 rows.push_back({list.name, exists ? "" : "missing", printable(file)});
         }
     }
-    if (options.json)
-        JsonWriter(Output::standard())
-            .beginObject()
-            .member("path", path)
-            .key("media")
-            .writeJson(media.endArray().text())
-            .endObject()
-            .endLine();
+    if (options.wantsJson())
+        writeRecord(options, [&](JsonWriter& json) {
+            json.beginObject().member("path", path).key("media").writeJson(media.endArray().text()).endObject();
+        });
     printRows(rows, {{"KIND"}, {"STATE"}, {"FILE"}}, options);
 }
 
@@ -89,7 +85,7 @@ void printProjectDirectories(const std::string& path, const CFileRef& base, std:
         if (create && !ask(true).IsValid())
             throw Failure("this folder cannot be created: " + std::string(directory));
         const bool exists = directory.IsFolder();
-        if (options.json)
+        if (options.wantsJson())
             directories.beginObject()
                 .member("type", value)
                 .member("directory", std::string(directory))
@@ -98,15 +94,12 @@ void printProjectDirectories(const std::string& path, const CFileRef& base, std:
         else
             rows.push_back({std::to_string(value), exists ? "" : "missing", printable(std::string(directory))});
     }
-    if (options.json)
-        JsonWriter(Output::standard())
-            .beginObject()
-            .member("path", path)
-            .member("directoryType", static_cast<int>(GetProjectDirectoryType(base)))
-            .member("layout", static_cast<int>(GetProjectLayout(base)))
-            .key("directories")
-            .writeJson(directories.endArray().text())
-            .endObject()
-            .endLine();
+    if (options.wantsJson())
+        writeRecord(options, [&](JsonWriter& json) {
+            json.beginObject().member("path", path);
+            json.member("directoryType", static_cast<int>(GetProjectDirectoryType(base)));
+            json.member("layout", static_cast<int>(GetProjectLayout(base)));
+            json.key("directories").writeJson(directories.endArray().text()).endObject();
+        });
     printRows(rows, {{"TYPE", Align::right}, {"STATE"}, {"FOLDER"}}, options);
 }

@@ -2,7 +2,7 @@
 
 #include "tool/project/ProjectPackage.h"
 #include "tool/shared/output/ClockTime.h"
-#include "tool/shared/output/JsonWriter.h"
+#include "tool/shared/output/JsonRecords.h"
 
 #include <charconv>
 #include <filesystem>
@@ -54,11 +54,12 @@ AlternativeReport reportOf(ProjectInformation& project, const std::string& key)
 void writeJson(JsonWriter& json, ProjectInformation& project, const AlternativeReport& report)
 {
     json.beginObject();
-    json.member("key", report.key).member("name", report.name).member("active", report.isActive);
+    json.member("key", report.key).knownMember("name", report.name).member("active", report.isActive);
     if (report.index) {
         json.member("index", *report.index);
         const platform::Dictionary* metaData = project.loadMetaDataForVariant(*report.index);
-        json.member("metaData", metaData != nullptr ? platform::Value(*metaData) : platform::Value());
+        if (metaData != nullptr)
+            json.member("metaData", platform::Value(*metaData));
         json.key("media").beginArray();
         for (const MediaCount& media : report.media)
             json.beginObject()
@@ -69,12 +70,16 @@ void writeJson(JsonWriter& json, ProjectInformation& project, const AlternativeR
         json.endArray();
         json.key("backups").beginArray();
         for (const ProjectBackup& backup : report.backups)
-            json.beginObject().member("name", backupName(backup.url)).member("date", dateText(backup.date)).endObject();
+            json.beginObject()
+                .member("name", backupName(backup.url))
+                .knownMember("date", dateText(backup.date))
+                .endObject();
         json.endArray();
-        if (const auto& exchange = report.interrupted)
-            json.member("interruptedExchange", exchange->backupURL
-                                                   ? std::optional(backupName(*exchange, project, *report.index))
-                                                   : std::nullopt);
+        if (const auto& exchange = report.interrupted) {
+            json.member("isExchangeInterrupted", true);
+            if (exchange->backupURL)
+                json.member("interruptedExchange", backupName(*exchange, project, *report.index));
+        }
     }
     json.endObject();
 }
@@ -146,10 +151,12 @@ void printProject(const std::string& path, ProjectInformation& project, const Ou
     Output& output = Output::standard();
     if (form == Form::none)
         return;
-    JsonWriter json(output);
+    JsonRecords records(options);
+    JsonWriter* json = nullptr;
     if (form == Form::json) {
-        json.beginObject().member("path", path).member("projectInfo", platform::Value(project.projectInfo()));
-        json.key("alternatives").beginArray();
+        json = &records.begin();
+        json->beginObject().member("path", path).member("projectInfo", platform::Value(project.projectInfo()));
+        json->key("alternatives").beginArray();
     } else if (form == Form::table) {
         const auto version = project.projectInfo().find(std::string_view(ProjectInfoKey::bundleVersion));
         const auto* number = version != project.projectInfo().end() ? version->second.get<std::int64_t>() : nullptr;
@@ -161,24 +168,28 @@ void printProject(const std::string& path, ProjectInformation& project, const Ou
     for (const std::string& key : project.variationIndexesSorted()) {
         const AlternativeReport report = reportOf(project, key);
         if (form == Form::json)
-            writeJson(json, project, report);
+            writeJson(*json, project, report);
         else if (form == Form::table)
             printTable(report, project, usesColor(options.color));
         else
             printLine(report, project);
     }
-    if (form == Form::json)
-        json.endArray().endObject().endLine();
+    if (form == Form::json) {
+        json->endArray().endObject();
+        records.end();
+        records.finish();
+    }
 }
 
 void printProjectEdit(const std::string& path, const OutputOptions& options, const ProjectMembers& members,
                       const std::string& sentence)
 {
-    if (options.json) {
-        JsonWriter json(Output::standard());
-        json.beginObject().member("path", path);
-        members(json);
-        json.endObject().endLine();
+    if (options.wantsJson()) {
+        writeRecord(options, [&](JsonWriter& json) {
+            json.beginObject().member("path", path);
+            members(json);
+            json.endObject();
+        });
     } else if (!options.quiet) {
         Output::standard().print("{}: {}\n", printable(path), sentence);
     }

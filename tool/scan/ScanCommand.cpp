@@ -17,12 +17,12 @@ constexpr std::size_t kBatch = 64;
 constexpr unsigned kBatchesPerThread = 8;
 constexpr unsigned kMostThreads = 256;
 
-using Batch = std::vector<ScanItem>;
+using Batch = std::vector<FoundFile>;
 using Records = std::vector<ScanRecord>;
 using ScanWork = OrderedWork<Batch, Records>;
 
 struct ScanArguments {
-    std::vector<std::string> folders;
+    FileArguments folders;
     bool csv = false;
     unsigned threads = 0;
 };
@@ -36,8 +36,8 @@ struct BadFile {
 void walkBatches(const std::vector<std::string>& folders, const std::function<bool(Batch)>& give)
 {
     Batch batch;
-    FolderWalk walk(folders, [&](const std::string& path, const std::string& problem) {
-        batch.push_back({path, problem});
+    FolderWalk walk(folders, [&](FoundFile file) {
+        batch.push_back(std::move(file));
         return batch.size() < kBatch || give(std::exchange(batch, {}));
     });
     if (walk.run() && !batch.empty())
@@ -48,7 +48,7 @@ void walkBatches(const std::vector<std::string>& folders, const std::function<bo
 void countInto(ScanProgress& progress, const std::vector<std::string>& folders, const std::stop_token& stop)
 {
     std::int64_t files = 0;
-    FolderWalk walk(folders, [&](const std::string&, const std::string&) {
+    FolderWalk walk(folders, [&](const FoundFile&) {
         ++files;
         return !stop.stop_requested();
     });
@@ -77,10 +77,11 @@ public:
         if (sharesTerminal && prints)
             progress_.hide();
         for (ScanRecord& record : records)
-            if (record.kind == ScanRecord::loop)
+            if (record.kind != ScanRecord::none) {
                 writer_.add(record);
-            else if (record.kind == ScanRecord::bad)
-                bad_.push_back({std::move(record.path), std::move(record.text)});
+                if (record.kind == ScanRecord::bad)
+                    bad_.push_back({std::move(record.path), std::move(record.text)});
+            }
         if (sharesTerminal && prints)
             output.flush();
         if (output.failed())
@@ -103,17 +104,16 @@ void scanHere(const std::vector<std::string>& folders, const std::function<Recor
     walkBatches(folders, [&](const Batch& batch) { return results.add(scan(batch)); });
 }
 
-void scanByThreads(const ScanArguments& arguments, const std::function<Records(const Batch&)>& scan,
-                   ResultWriter& results)
+void scanByThreads(const std::vector<std::string>& folders, unsigned threads,
+                   const std::function<Records(const Batch&)>& scan, ResultWriter& results)
 {
-    const unsigned threads = threadsFor(arguments);
     ScanWork work(threads, std::size_t{threads} * kBatchesPerThread, scan);
     const std::jthread walker = startedThread([&] {
-        walkBatches(arguments.folders, [&](Batch batch) { return work.give(std::move(batch)); });
+        walkBatches(folders, [&](Batch batch) { return work.give(std::move(batch)); });
         work.close();
     });
     if (!walker.joinable()) // it and who takes its results must not be one thread
-        return scanHere(arguments.folders, scan, results);
+        return scanHere(folders, scan, results);
     while (auto records = work.take())
         if (!results.add(std::move(*records)))
             break;
@@ -122,22 +122,25 @@ void scanByThreads(const ScanArguments& arguments, const std::function<Records(c
 
 bool runScan(const ScanArguments& arguments, const OutputOptions& options)
 {
-    if (arguments.csv && options.json)
-        throw UsageError("--csv and --json exclude each other");
+    if (arguments.csv && options.wantsJson())
+        throw UsageError("--csv and JSON exclude each other");
+    std::vector<std::string> folders;
+    if (!reportingRecord(arguments.folders.listName(), options, [&] { folders = allNames(arguments.folders); }))
+        return false;
     const ScanForm form = arguments.csv ? ScanForm::csv : scanForm(outputForm(options));
-    ScanWriter writer(form, usesColor(options.color));
+    ScanWriter writer(form, options);
     ScanProgress progress(options.quiet);
     ResultWriter results(writer, progress);
     {
         std::jthread counter;
         if (progress.isActive())
-            counter = startedThread([&](const std::stop_token& stop) { countInto(progress, arguments.folders, stop); });
+            counter = startedThread([&](const std::stop_token& stop) { countInto(progress, folders, stop); });
         scanByThreads(
-            arguments,
+            folders, threadsFor(arguments),
             [form](const Batch& batch) {
                 Records records;
-                for (const ScanItem& item : batch)
-                    records.push_back(scanFile(item, form));
+                for (const FoundFile& file : batch)
+                    records.push_back(scanFile(file, form));
                 return records;
             },
             results);
@@ -155,7 +158,7 @@ void declareScan(CommandLine& commandLine)
     static ScanArguments arguments;
     Verb& verb = commandLine.addVerb("scan", "List the loops below folders, with their tags",
                                      [&commandLine] { return runScan(arguments, commandLine.output()); });
-    CommandLine::addFiles(verb, arguments.folders, "FOLDER").required().describe("The folders");
+    CommandLine::addFiles(verb, arguments.folders, "FOLDER").describe("The folders");
     verb.addFlag("--csv", arguments.csv, "Print comma-separated values (RFC 4180), with a header");
     verb.addNumber("-j,--threads", arguments.threads, {1, kMostThreads},
                    "How many files are read at once; else one per core");

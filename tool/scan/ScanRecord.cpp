@@ -13,10 +13,11 @@ namespace {
 
 // The columns of CSV, by the names that JSON has for them.
 constexpr const char* kColumns[] = {
-    "path",         "fileType",        "tempo",        "beatCount",      "midiRootNote",      "keyType",
-    "signatureTop", "signatureBottom", "loopFileType", "instrumentType", "instrumentSubType", "genre",
-    "descriptors",  "title",           "artist",       "copyright",      "comments",          "transients",
-    "chunks"};
+    "path",         "fileType",        "containerName", "sampleRate",   "frames",         "durationSeconds",
+    "tempo",        "beatCount",       "midiRootNote",  "key",          "keyType",        "mode",
+    "signatureTop", "signatureBottom", "signature",     "loopFileType", "instrumentType", "instrumentSubType",
+    "genre",        "descriptors",     "title",         "artist",       "copyright",      "comments",
+    "transients",   "chunks"};
 
 bool isCalledLoop(const std::string& path)
 {
@@ -69,8 +70,7 @@ std::string chunkIds(const LoopTags& tags)
 
 std::string csvLine(const std::string& path, const LoopTags& tags)
 {
-    std::vector<TagValue> values = tagValues(tags);
-    values.push_back({"fileType", fourCCText(tags.fileType)});
+    std::vector<TagValue> values = tagRecord(tags);
     values.push_back({"transients", tags.transients.size()});
     values.push_back({"chunks", chunkIds(tags)});
     std::string line;
@@ -130,7 +130,7 @@ ScanForm scanForm(Form form)
     return ScanForm::none;
 }
 
-ScanRecord scanFile(const ScanItem& item, ScanForm form)
+ScanRecord scanFile(const FoundFile& item, ScanForm form)
 {
     ScanRecord record;
     record.path = item.path;
@@ -145,8 +145,8 @@ ScanRecord scanFile(const ScanItem& item, ScanForm form)
     try {
         if (const LoopTags tags = readLoopTags(item.path); tags.isLoop())
             fill(record, tags, form);
-    } catch (const NoLoopContainer& other) {
-        if (!other.isKnown() && isCalledLoop(item.path))
+    } catch (const OtherKind& other) {
+        if (!other.isAudio() && isCalledLoop(item.path))
             fail(other.what());
     } catch (const Failure& failure) {
         // A link that leads nowhere is of interest only when it should lead to a loop.
@@ -159,16 +159,17 @@ ScanRecord scanFile(const ScanItem& item, ScanForm form)
 }
 
 // Rows are written as they come, so that the widths are set beforehand; the path, which no width fits, comes last.
-ScanWriter::ScanWriter(ScanForm form, bool color)
+ScanWriter::ScanWriter(ScanForm form, const OutputOptions& options)
     : form_(form),
-      color_(color),
+      color_(usesColor(options.color)),
       table_({{"TEMPO", Align::right, 7},
               {"BEATS", Align::right},
               {"KEY", Align::left, 8},
               {"SIGNATURE"},
               {"CATEGORY", Align::left, 16},
               {"GENRE", Align::left, 16},
-              {"FILE"}})
+              {"FILE"}}),
+      json_(options)
 {
     if (form_ != ScanForm::csv)
         return;
@@ -179,6 +180,11 @@ ScanWriter::ScanWriter(ScanForm form, bool color)
 
 void ScanWriter::add(const ScanRecord& record)
 {
+    if (record.kind == ScanRecord::bad) {
+        if (form_ == ScanForm::json)
+            json_.addFailure(record.path, record.text);
+        return;
+    }
     const bool first = std::exchange(first_, false);
     if (form_ == ScanForm::table) {
         if (first)
@@ -186,10 +192,12 @@ void ScanWriter::add(const ScanRecord& record)
         table_.printRow(output_, record.cells);
         return;
     }
-    if (form_ == ScanForm::json)
-        json_.next().writeJson(record.text);
-    else
+    if (form_ == ScanForm::json) {
+        json_.begin().writeJson(record.text);
+        json_.end();
+    } else {
         output_.write(record.text);
+    }
 }
 
 void ScanWriter::finish()

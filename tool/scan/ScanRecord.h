@@ -1,6 +1,7 @@
 // One file of a scan: read by any thread and put into the form of the output, then written in order.
 #pragma once
 
+#include "tool/shared/input/FoundFile.h"
 #include "tool/shared/output/JsonRecords.h"
 #include "tool/shared/output/Table.h"
 
@@ -9,12 +10,6 @@
 
 enum class ScanForm { table, lines, json, csv, none };
 ScanForm scanForm(Form form);
-
-/// What the walk over the folders met; `problem` is why a folder could not be read, or empty.
-struct ScanItem {
-    std::string path;
-    std::string problem;
-};
 
 struct ScanRecord {
     enum Kind { none, loop, bad };
@@ -27,12 +22,12 @@ struct ScanRecord {
 /// Reads one file. A loop is an AIFF or CAF file that has loop tags, transients or another loop chunk. Bad is what
 /// cannot be read, but of the files that hold no known audio, and of links to nothing, only those that are called so
 /// (".aif", ".aiff", ".caf"). Throws nothing.
-ScanRecord scanFile(const ScanItem& item, ScanForm form);
+ScanRecord scanFile(const FoundFile& file, ScanForm form);
 
-/// Writes the records of the loops.
+/// Writes the records of the loops, and in JSON those of bad files.
 class ScanWriter {
 public:
-    ScanWriter(ScanForm form, bool color);
+    ScanWriter(ScanForm form, const OutputOptions& options);
     void add(const ScanRecord& record);
     void finish();
 

@@ -16,20 +16,23 @@ public:
     TagsWriter(const OutputOptions& options, bool several)
         : form_(outputForm(options)),
           color_(usesColor(options.color)),
-          several_(several)
+          several_(several),
+          json_(options)
     {
     }
 
     void add(const std::string& path, const LoopTags& tags)
     {
-        if (form_ == Form::json)
-            writeLoopTags(json_.next(), path, tags);
-        else if (form_ == Form::table)
+        if (form_ == Form::json) {
+            writeLoopTags(json_.begin(), path, tags);
+            json_.end();
+        } else if (form_ == Form::table) {
             addTable(path, tags);
-        else if (form_ == Form::lines)
+        } else if (form_ == Form::lines) {
             for (const TagLine& line : tagLines(tags))
                 output_.print("{}{}{}\t{}\n", several_ ? printable(path) : "", several_ ? "\t" : "", line.name,
                               printable(line.text));
+        }
         first_ = false;
     }
 
@@ -67,24 +70,20 @@ private:
     JsonRecords json_;
 };
 
-bool runTags(const std::vector<std::string>& files, const OutputOptions& options)
+bool runTags(const FileArguments& files, const OutputOptions& options)
 {
-    TagsWriter writer(options, files.size() > 1);
-    return writeFileByFile(writer, files, [&](const std::string& path) {
-        const FileAccess access = accessForReading(path, {.quiet = options.quiet});
-        return readLoopTags(path);
+    TagsWriter writer(options, files.maybeSeveral());
+    return writeFileByFile(writer, files, options, [&](const FoundFile& file) {
+        const FileAccess access = accessForReading(file.path, {.quiet = options.quiet});
+        return readLoopTags(file.path);
     });
 }
 
 void declareTags(CommandLine& commandLine)
 {
-    static std::vector<std::string> files;
+    static FileArguments files;
     Verb& verb = commandLine.addVerb("tags", "Show the loop tags of AIFF and CAF files; set, remove or copy some",
-                                     [&commandLine] {
-                                         if (files.empty())
-                                             throw MissingArgument("FILE");
-                                         return runTags(files, commandLine.output());
-                                     });
+                                     [&commandLine] { return runTags(files, commandLine.output()); });
     CommandLine::addFiles(verb, files);
     declareTagsSet(commandLine, verb);
     declareTagsRemove(commandLine, verb);

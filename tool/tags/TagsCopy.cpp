@@ -9,7 +9,7 @@ namespace {
 
 struct CopyArguments {
     std::string from;
-    std::vector<std::string> to;
+    FileArguments to;
     EditOptions options;
 };
 
@@ -38,6 +38,6 @@ void declareTagsCopy(CommandLine& commandLine, Verb& tags)
         "copy", "Copy all that makes a loop to other files",
         [&commandLine] { return runCopy(arguments, commandLine.output()); }, &tags);
     CommandLine::addFile(verb, arguments.from, "FROM").required().describe("The file to copy from");
-    CommandLine::addFiles(verb, arguments.to, "TO").required().describe("The files to copy to");
+    CommandLine::addFiles(verb, arguments.to, "TO").describe("The files to copy to");
     CommandLine::addEditOptions(verb, arguments.options);
 }

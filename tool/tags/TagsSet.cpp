@@ -206,35 +206,38 @@ TagsPlan planRemoval(const LoopTags& before, const std::string& path)
 
 struct SetArguments {
     std::vector<std::string> words;
+    FileArguments files; // those of the list; the others are among the words
     EditOptions options;
 };
 
-bool runSet(const SetArguments& arguments, const OutputOptions& output)
+bool runSet(SetArguments& arguments, const OutputOptions& output)
 {
     const TagArguments parsed = parseAssignments(arguments.words);
+    arguments.files.names = parsed.files;
     const TagsEditor editor{"set", "set", "would set", [&](const LoopTags& before, const std::string& path) {
                                 return planAssignments(before, path, parsed.assignments);
                             }};
-    return editTags(parsed.files, editor, arguments.options, output);
+    return editTags(arguments.files, editor, arguments.options, output);
 }
 
-bool runRemove(const SetArguments& arguments, const OutputOptions& output)
+bool runRemove(SetArguments& arguments, const OutputOptions& output)
 {
     const TagArguments parsed = parseKeys(arguments.words);
+    arguments.files.names = parsed.files;
     const TagsEditor editor{"remove", "removed", "would remove", [&](const LoopTags& before, const std::string& path) {
                                 return parsed.assignments.empty() ? planRemoval(before, path)
                                                                   : planAssignments(before, path, parsed.assignments);
                             }};
-    return editTags(parsed.files, editor, arguments.options, output);
+    return editTags(arguments.files, editor, arguments.options, output);
 }
 
 void declareEdit(CommandLine& commandLine, Verb& tags, const std::string& name, const std::string& description,
-                 const std::string& words, SetArguments& arguments,
-                 bool (*run)(const SetArguments&, const OutputOptions&))
+                 const std::string& words, SetArguments& arguments, bool (*run)(SetArguments&, const OutputOptions&))
 {
     Verb& verb = commandLine.addVerb(
         name, description, [&commandLine, &arguments, run] { return run(arguments, commandLine.output()); }, &tags);
-    CommandLine::addFiles(verb, arguments.words).required().describe(words);
+    CommandLine::addFiles(verb, arguments.words).describe(words);
+    CommandLine::addFileList(verb, arguments.files);
     CommandLine::addEditOptions(verb, arguments.options);
 }
 

@@ -93,8 +93,13 @@ Verb& CommandLine::addVerb(const std::string& name, const std::string& descripti
 
 void CommandLine::addOutputOptions(Verb& verb)
 {
-    verb.addFlag("--json", output_.json, "Print JSON");
-    verb.addFlag("-q,--quiet", output_.quiet, "Print nothing but errors, and what --json asks for");
+    const Argument array = verb.addFlag(
+        "--json", [this] { output_.json = JsonShape::array; }, "Print JSON: an array of objects");
+    verb.addFlag(
+            "--jsonl,--ndjson", [this] { output_.json = JsonShape::lines; },
+            "Print JSON: an object on each line, as soon as it is known")
+        .excludes(array);
+    verb.addFlag("-q,--quiet", output_.quiet, "Print nothing but errors, and the JSON that is asked for");
     const auto setColor = [this](const std::string& name) {
         for (const auto& [text, mode] : kColorModes)
             if (text == name)
@@ -112,6 +117,22 @@ Argument CommandLine::addFile(Verb& verb, std::string& file, const std::string& 
 Argument CommandLine::addFiles(Verb& verb, std::vector<std::string>& files, const std::string& name)
 {
     return verb.addTexts(name, files, "The audio files", fileProblem);
+}
+
+Argument CommandLine::addFiles(Verb& verb, FileArguments& files, const std::string& name)
+{
+    files.label = name;
+    const Argument added = addFiles(verb, files.names, name);
+    addFileList(verb, files);
+    return Argument(added).describe("The audio files, and folders of them");
+}
+
+void CommandLine::addFileList(Verb& verb, FileArguments& files)
+{
+    verb.addText("--files-from", files.list, "Also the files that LIST names, one on a line; \"-\" is standard input",
+                 pathProblem)
+        .label("LIST");
+    verb.addFlag("-0,--null", files.isNulSeparated, "A NUL byte ends each name in LIST, not the line");
 }
 
 Argument CommandLine::addChunkId(Verb& verb, FourCC& id)

@@ -6,6 +6,7 @@
 #include "tool/shared/arguments/Verb.h"
 #include "tool/shared/edits/OutputFile.h"
 #include "tool/shared/edits/SafeEdit.h"
+#include "tool/shared/input/FileArguments.h"
 #include "tool/shared/output/Output.h"
 
 #include <string>
@@ -27,6 +28,9 @@ public:
     // Arguments that verbs have in common. The values must outlive the parsing.
     static Argument addFile(Verb& verb, std::string& file, const std::string& name = "FILE");
     static Argument addFiles(Verb& verb, std::vector<std::string>& files, const std::string& name = "FILE");
+    /// Also folders, and lists by the options --files-from and -0. That there is a name at all is seen by `allNames`.
+    static Argument addFiles(Verb& verb, FileArguments& files, const std::string& name = "FILE");
+    static void addFileList(Verb& verb, FileArguments& files);
     static Argument addChunkId(Verb& verb, FourCC& id);
     /// An option whose value names a file; "-" stands for standard input or output.
     static Argument addPath(Verb& verb, const std::string& name, std::string& path, const std::string& description);

@@ -3,6 +3,7 @@
 #include "tool/shared/access/FileLock.h"
 #include "tool/shared/edits/EditProblems.h"
 #include "tool/shared/edits/EndingSignals.h"
+#include "tool/shared/input/FolderWalk.h"
 #include "tool/shared/input/InputFile.h"
 #include "tool/shared/output/Failure.h"
 #include "tool/shared/output/Progress.h"
@@ -22,6 +23,8 @@ FileAccess accessFor(const std::string& target, const EditOptions& options)
 
 SafeEdit::SafeEdit(const std::string& path, const EditOptions& options) : options_(options)
 {
+    if (isFolder(path))
+        throw Failure("is a folder, and edits take files only");
     const std::string target = resolvedPath(path);
     access_ = accessFor(target, options_);
     removeTemporaryFilesAtEndingSignals();

@@ -24,11 +24,18 @@ std::string joined(const std::string& folder, const std::string& name)
 
 } // namespace
 
+bool isFolder(const std::string& path)
+{
+    struct stat status = {};
+    return ::stat(path.c_str(), &status) == 0 && S_ISDIR(status.st_mode);
+}
+
 FolderWalk::FolderWalk(std::vector<std::string> roots, Visit visit) : roots_(std::move(roots)), visit_(std::move(visit))
 {
     for (const std::string& root : roots_)
-        if (const std::string path = resolved(root); !path.empty())
-            resolvedRoots_.push_back(path.ends_with('/') ? path : path + "/");
+        if (isFolder(root))
+            if (const std::string path = resolved(root); !path.empty())
+                resolvedRoots_.push_back(path.ends_with('/') ? path : path + "/");
 }
 
 bool FolderWalk::run()
@@ -36,9 +43,17 @@ bool FolderWalk::run()
     return std::all_of(roots_.begin(), roots_.end(), [this](const std::string& root) {
         struct stat status = {};
         if (::stat(root.c_str(), &status) != 0)
-            return visit_(root, systemErrorText(errno));
-        return S_ISDIR(status.st_mode) ? walk(root) : visit_(root, "");
+            return visit_({root, systemErrorText(errno)});
+        if (!S_ISDIR(status.st_mode))
+            return visit_({root, {}});
+        rootLength_ = root.size();
+        return walk(root);
     });
+}
+
+bool FolderWalk::visit(const std::string& path, const std::string& problem) const
+{
+    return visit_({path, problem, rootLength_});
 }
 
 std::vector<FolderWalk::Entry> FolderWalk::entriesOf(const std::string& folder, int& error)
@@ -70,7 +85,7 @@ bool FolderWalk::walk(const std::string& folder)
         return true;
     int error = 0;
     const std::vector<Entry> entries = entriesOf(folder, error);
-    if (error != 0 && !visit_(folder, systemErrorText(error)))
+    if (error != 0 && !visit(folder, systemErrorText(error)))
         return false;
     return std::all_of(entries.begin(), entries.end(),
                        [&](const Entry& entry) { return visitEntry(joined(folder, entry.name), entry); });
@@ -79,17 +94,17 @@ bool FolderWalk::walk(const std::string& folder)
 bool FolderWalk::visitEntry(const std::string& path, const Entry& entry)
 {
     if (entry.type == DT_REG)
-        return visit_(path, "");
+        return visit(path);
     if (entry.type == DT_DIR)
         return walk(path);
     if (entry.type != DT_LNK && entry.type != DT_UNKNOWN)
         return true;
     struct stat status = {}, link = {};
     if (::lstat(path.c_str(), &link) != 0 || ::stat(path.c_str(), &status) != 0)
-        return visit_(path, ""); // whoever opens it will find out, and knows whether it matters
+        return visit(path); // whoever opens it will find out, and knows whether it matters
     if (S_ISDIR(status.st_mode))
         return (S_ISLNK(link.st_mode) && leadsInside(path)) || walk(path);
-    return !S_ISREG(status.st_mode) || visit_(path, "");
+    return !S_ISREG(status.st_mode) || visit(path);
 }
 
 bool FolderWalk::isNew(const std::string& folder)

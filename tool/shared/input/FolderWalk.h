@@ -1,20 +1,26 @@
 // The files below folders, in a stable order.
 #pragma once
 
+#include "tool/shared/input/FoundFile.h"
+
 #include <functional>
 #include <set>
 #include <string>
 #include <utility>
 #include <vector>
 
+/// Whether the path leads to a folder.
+bool isFolder(const std::string& path);
+
 /// Visits each folder once, in the order of its names' bytes, and holds no more than the names of the folders that it
 /// is in. Names that begin with a dot are left out. Links to files are files; a link to a folder is followed when it
 /// leads out of the folders named, so that nothing is met twice and no circle is walked.
 class FolderWalk {
 public:
-    /// `problem` is empty, or says why a folder could not be read. False ends the walk.
-    using Visit = std::function<bool(const std::string& path, const std::string& problem)>;
+    /// False ends the walk.
+    using Visit = std::function<bool(FoundFile file)>;
 
+    /// The roots may be files too, which are visited whatever they are.
     FolderWalk(std::vector<std::string> roots, Visit visit);
     /// False when it was ended.
     bool run();
@@ -27,6 +33,7 @@ private:
 
     bool walk(const std::string& folder);
     bool visitEntry(const std::string& path, const Entry& entry);
+    bool visit(const std::string& path, const std::string& problem = {}) const;
     bool isNew(const std::string& folder);
     bool leadsInside(const std::string& link) const;
     static std::vector<Entry> entriesOf(const std::string& folder, int& error);
@@ -34,5 +41,6 @@ private:
     std::vector<std::string> roots_;
     std::vector<std::string> resolvedRoots_;
     Visit visit_;
+    std::size_t rootLength_ = 0;                             // of the folder that is walked
     std::set<std::pair<std::uint64_t, std::uint64_t>> seen_; // device and inode of folders
 };

@@ -3,6 +3,7 @@
 #include "audiofile/ContainerChanges.h"
 #include "platform/core/Status.h"
 #include "tool/shared/edits/EditProblems.h"
+#include "tool/shared/input/FoundFile.h"
 #include "tool/shared/output/Failure.h"
 
 #include <cerrno>
@@ -41,7 +42,7 @@ CFileRef referenceTo(const std::string& path)
     if (error)
         throw Failure(systemErrorText(error.value()));
     if (platform::String::fromFileSystemRepresentation(absolute.c_str()).isNull())
-        throw Failure("its path is not valid UTF-8");
+        throw OtherKind("its path is not valid UTF-8", OtherKind::Kind::unknown);
     CFileRef reference(absolute.c_str(), false);
     if (!reference.IsValid())
         throw Failure("its path cannot be a file URL");
@@ -52,9 +53,9 @@ void openAudio(CAudioFileIO& file, const std::string& path)
 {
     requireOK(file.Open(referenceTo(path), 0));
     if (file.GetEOF() == 0)
-        throw Failure("is empty");
+        throw OtherKind("is empty", OtherKind::Kind::unknown);
     if (file.Info().fileType == 0)
-        throw Failure("no audio file known here");
+        throw OtherKind("no audio file known here", OtherKind::Kind::unknown);
 }
 
 void requireDecoder(CAudioFileIO& file)
@@ -72,6 +73,11 @@ void openContainer(CAudioFileIO& file, const std::string& path, unsigned int mod
 void openChunks(CAudioFileIO& file, const std::string& path)
 {
     requireOK(file.OpenForChunks(referenceTo(path), 0));
-    if (!file.HasChunks())
-        openContainer(file, path, 0); // which says why
+    if (file.HasChunks())
+        return;
+    try {
+        openContainer(file, path, 0);
+    } catch (const Failure& failure) { // which says why
+        throw OtherKind(failure.what(), isCalledContainer(path) ? OtherKind::Kind::unknown : OtherKind::Kind::audio);
+    }
 }

@@ -206,8 +206,6 @@ TagArguments parseAssignments(std::span<const std::string> arguments)
             assign(parsed.assignments, std::string_view(argument).substr(0, equals),
                    std::string_view(argument).substr(equals + 1));
     }
-    if (parsed.files.empty())
-        throw MissingArgument("FILE");
     if (parsed.assignments.empty())
         refuse("KEY=VALUE is missing; keys are " + knownKeys());
     return parsed;
@@ -227,8 +225,6 @@ TagArguments parseKeys(std::span<const std::string> arguments)
         for (const TagField* field : fields)
             parsed.assignments.push_back({field, {}});
     }
-    if (parsed.files.empty())
-        throw MissingArgument("FILE");
     return parsed;
 }
 

@@ -199,13 +199,13 @@ VireoLoopChunksManager openLoopFile(const std::string& path, AudioFile::Permissi
     if (manager.status() != kStatusOK)
         requireRegularFile(path); // says best what is wrong with it
     if (manager.status() == kStatusParameterError)
-        throw NoLoopContainer("is no AIFF or CAF file", false);
+        throw OtherKind("is no AIFF or CAF file", OtherKind::Kind::unknown);
     requireOK(manager.status());
     const FourCC type = manager.audioFileTypeID();
     if (type != kAIFF && type != kCaff)
-        throw NoLoopContainer(fmt::format("is {} file; only AIFF and CAF files hold loop tags",
-                                          type == kWAVE ? "a WAVE" : "an " + fourCCText(type)),
-                              true);
+        throw OtherKind(fmt::format("is {} file; only AIFF and CAF files hold loop tags",
+                                    type == kWAVE ? "a WAVE" : "an " + fourCCText(type)),
+                        OtherKind::Kind::audio);
     return manager;
 }
 
@@ -264,13 +264,25 @@ std::string tagText(const LoopTags& tags, const char* name)
     return shown->text(tags);
 }
 
+bool isAbsent(const platform::Value& value)
+{
+    if (const auto* number = value.get<std::int64_t>())
+        return *number == 0;
+    if (const auto* number = value.get<double>())
+        return *number == 0;
+    if (const auto* text = value.get<std::string>())
+        return text->empty();
+    const auto* list = value.get<platform::Array>();
+    return list == nullptr || std::all_of(list->begin(), list->end(), isAbsent);
+}
+
 std::vector<TagValue> tagValues(const LoopTags& tags)
 {
     std::vector<TagValue> present;
     for (const TagField& field : tagFields()) {
         const platform::Dictionary& values = field.isFileInfo ? tags.info : tags.combined;
         const auto found = field.key != nullptr ? values.find(field.key) : values.end();
-        if (found != values.end())
+        if (found != values.end() && !isAbsent(found->second))
             present.push_back({field.name, found->second});
     }
     if (const double tempo = tags.tempo(); tempo > 0)
@@ -278,10 +290,35 @@ std::vector<TagValue> tagValues(const LoopTags& tags)
     return present;
 }
 
+std::vector<TagValue> tagRecord(const LoopTags& tags)
+{
+    std::vector<TagValue> record{{"fileType", fourCCText(tags.fileType)},
+                                 {"containerName", loopContainerName(tags.fileType)}};
+    if (tags.sampleRate > 0) {
+        record.push_back({"sampleRate", std::llround(tags.sampleRate)});
+        record.push_back({"frames", tags.frames});
+        record.push_back({"durationSeconds", static_cast<double>(tags.frames) / tags.sampleRate});
+    }
+    for (TagValue& tag : tagValues(tags)) {
+        const auto* const number = tag.value.get<std::int64_t>();
+        const std::string_view note = tag.name == "midiRootNote" && number ? VireoLoopNoteName(*number) : "";
+        const std::string_view mode = tag.name == "keyType" && number ? VireoLoopModeName(*number) : "";
+        const bool endsSignature = tag.name == "signatureBottom";
+        record.push_back(std::move(tag));
+        if (!note.empty())
+            record.push_back({"key", std::string(note)});
+        if (!mode.empty())
+            record.push_back({"mode", std::string(mode)});
+        if (endsSignature)
+            record.push_back({"signature", signatureText(tags)});
+    }
+    return record;
+}
+
 void writeLoopTags(JsonWriter& json, const std::string& path, const LoopTags& tags)
 {
-    json.beginObject().member("path", path).member("fileType", fourCCText(tags.fileType));
-    for (const TagValue& tag : tagValues(tags))
+    json.beginObject().member("path", path);
+    for (const TagValue& tag : tagRecord(tags))
         json.member(tag.name, tag.value);
     if (!tags.chunks.empty()) {
         json.key("chunks").beginArray();

@@ -37,18 +37,7 @@ struct LoopTags {
     bool isLoop() const { return !combined.empty() || !transients.empty() || !chunks.empty(); }
 };
 
-/// The Failure of a file that is whole, perhaps, but of a kind without loop tags.
-class NoLoopContainer : public Failure {
-public:
-    /// `isKnown` for an audio file of another kind; else it may be anything.
-    NoLoopContainer(const std::string& text, bool isKnown) : Failure(text), isKnown_(isKnown) {}
-    bool isKnown() const { return isKnown_; }
-
-private:
-    bool isKnown_;
-};
-
-/// Opens a file that can hold loop tags; throws Failure, also for a WAVE or AIFC file.
+/// Opens a file that can hold loop tags; throws Failure, for another OtherKind.
 VireoLoopChunksManager openLoopFile(const std::string& path, platform::AudioFile::Permission permission);
 
 /// Reads them, and of the chunks that are not interpreted only the sizes. Throws Failure.
@@ -76,7 +65,11 @@ struct TagValue {
     std::string name;
     platform::Value value;
 };
+/// Null and zero, empty texts and empty lists are no tag.
+bool isAbsent(const platform::Value& value);
 /// All tags that are present, in the order of output; not the transients and the chunks.
 std::vector<TagValue> tagValues(const LoopTags& tags);
+/// The same as records have them: what is known of the sound first, and words beside the numbers that stand for them.
+std::vector<TagValue> tagRecord(const LoopTags& tags);
 /// The whole JSON object, on one line.
 void writeLoopTags(JsonWriter& json, const std::string& path, const LoopTags& tags);

@@ -79,13 +79,14 @@ public:
     EditReport(const TagsEditor& editor, const EditOptions& edit, const OutputOptions& output)
         : editor_(editor),
           edit_(edit),
-          output_(output)
+          output_(output),
+          json_(output)
     {
     }
 
     void add(const std::string& path, const TagsPlan& plan, const std::string& backup)
     {
-        if (output_.json)
+        if (output_.wantsJson())
             addJson(path, plan, backup);
         else if (!output_.quiet)
             Output::standard().print("{}\n", printable(sentence(path, plan, backup)));
@@ -93,14 +94,14 @@ public:
 
     void addFailure(const std::string& path, const std::string& text)
     {
-        if (output_.json)
+        if (output_.wantsJson())
             json_.addFailure(path, text);
         reportFailure(path, text);
     }
 
     void finish()
     {
-        if (output_.json)
+        if (output_.wantsJson())
             json_.finish();
     }
 
@@ -119,22 +120,22 @@ private:
 
     void addJson(const std::string& path, const TagsPlan& plan, const std::string& backup)
     {
-        JsonWriter& json = json_.next();
+        JsonWriter& json = json_.begin();
         json.beginObject().member("path", path).member("action", editor_.action);
         json.key("changes").beginArray();
         for (const TagChange& change : plan.changes)
             json.beginObject()
                 .member("key", change.key)
-                .member("from", change.from)
-                .member("to", change.to)
+                .knownMember("from", change.from)
+                .knownMember("to", change.to)
                 .endObject();
         json.endArray();
         if (!plan.notKept.empty())
             json.member("notKept", plan.notKept);
         json.member("dryRun", edit_.dryRun);
-        if (!backup.empty())
-            json.member("backup", backup);
+        json.knownMember("backup", backup);
         json.endObject();
+        json_.end();
     }
 
     const TagsEditor& editor_;
@@ -154,18 +155,6 @@ void editFile(const std::string& path, const TagsEditor& editor, const EditOptio
 }
 
 } // namespace
-
-bool isAbsent(const platform::Value& value)
-{
-    if (const auto* number = value.get<std::int64_t>())
-        return *number == 0;
-    if (const auto* number = value.get<double>())
-        return *number == 0;
-    if (const auto* text = value.get<std::string>())
-        return text->empty();
-    const auto* list = value.get<platform::Array>();
-    return list == nullptr || std::all_of(list->begin(), list->end(), isAbsent);
-}
 
 std::vector<TagChange> differences(const LoopTags& before, const LoopTags& after)
 {
@@ -194,9 +183,11 @@ void writeTags(const std::string& path, const TagsPlan& plan)
         throw Failure("the tags are not found as they should be after the edit: " + wrong.front().key);
 }
 
-bool editTags(const std::vector<std::string>& files, const TagsEditor& editor, EditOptions edit,
-              const OutputOptions& output)
+bool editTags(const FileArguments& named, const TagsEditor& editor, EditOptions edit, const OutputOptions& output)
 {
+    std::vector<std::string> files;
+    if (!reportingRecord(named.listName(), output, [&] { files = allNames(named); }))
+        return false;
     edit.quiet = output.quiet;
     for (const std::string& path : files)
         try {

@@ -3,6 +3,7 @@
 #pragma once
 
 #include "tool/shared/edits/SafeEdit.h"
+#include "tool/shared/input/FileArguments.h"
 #include "tool/shared/looptags/LoopTags.h"
 #include "tool/shared/looptags/RawLoopTags.h"
 #include "tool/shared/output/Output.h"
@@ -32,9 +33,6 @@ struct TagsPlan {
 /// What differs, transients and carried chunks compared by number and size.
 std::vector<TagChange> differences(const LoopTags& before, const LoopTags& after);
 
-/// Null and zero, empty texts and empty lists are no tag.
-bool isAbsent(const platform::Value& value);
-
 /// Makes the planned edit of the file itself, and reads it again. Throws Failure, also when the tags are then not found
 /// as they should be.
 void writeTags(const std::string& path, const TagsPlan& plan);
@@ -50,5 +48,4 @@ struct TagsEditor {
 
 /// Edits one file after the other and reports each; false when one failed. Mistakes on the command line that show only
 /// in the light of a file are found before the first file is touched.
-bool editTags(const std::vector<std::string>& files, const TagsEditor& editor, EditOptions edit,
-              const OutputOptions& output);
+bool editTags(const FileArguments& files, const TagsEditor& editor, EditOptions edit, const OutputOptions& output);

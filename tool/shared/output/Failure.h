@@ -12,6 +12,24 @@ public:
     using std::runtime_error::runtime_error;
 };
 
+/// The Failure of a file that is whole, perhaps, but of another kind than the verb works on.
+class OtherKind : public Failure {
+public:
+    enum class Kind { audio, unknown };
+    OtherKind(const std::string& text, Kind kind) : Failure(text), kind_(kind) {}
+    /// Else it may be anything.
+    bool isAudio() const { return kind_ == Kind::audio; }
+
+private:
+    Kind kind_;
+};
+
+/// The Failure that standard error has been told of already.
+class ToldFailure : public Failure {
+public:
+    using Failure::Failure;
+};
+
 /// A short text for a system error number, in the vocabulary of the library's status codes where they have one.
 std::string systemErrorText(int error);
 

@@ -2,35 +2,44 @@
 
 #include <utility>
 
-JsonWriter& JsonRecords::next()
+JsonRecords::JsonRecords(const OutputOptions& options) : shape_(options.json)
 {
-    if (shape_ == Shape::single)
+    if (shape_ == JsonShape::lines)
+        json_.keepToOneLine();
+}
+
+JsonWriter& JsonRecords::begin()
+{
+    if (shape_ == JsonShape::lines)
         return json_;
     beginArray();
     return json_.newLine();
 }
 
+void JsonRecords::end()
+{
+    if (shape_ != JsonShape::lines)
+        return;
+    json_.endLine();
+    Output::standard().flush();
+}
+
 void JsonRecords::addFailure(const std::string& path, const std::string& text)
 {
-    writeFailure(next(), path, text);
+    begin().beginObject().member("path", path).member("error", text).endObject();
+    end();
 }
 
 void JsonRecords::finish()
 {
-    if (shape_ == Shape::array) {
-        beginArray();
-        json_.endArrayOfLines();
-    }
-    json_.endLine();
+    if (shape_ == JsonShape::lines)
+        return;
+    beginArray();
+    json_.endArrayOfLines().endLine();
 }
 
 void JsonRecords::beginArray()
 {
     if (!std::exchange(hasBegun_, true))
         json_.beginArray();
-}
-
-void writeFailure(JsonWriter& json, const std::string& path, const std::string& text)
-{
-    json.beginObject().member("path", path).member("error", text).endObject();
 }

@@ -32,7 +32,7 @@ public:
     /// Of an array whose elements began with `newLine`, if there are any.
     JsonWriter& endArrayOfLines()
     {
-        if (!isFirst_)
+        if (!isFirst_ && !keepsToOneLine_)
             put('\n');
         return end(']');
     }
@@ -40,9 +40,12 @@ public:
     JsonWriter& newLine()
     {
         separate();
-        put('\n');
+        if (!keepsToOneLine_)
+            put('\n');
         return *this;
     }
+    /// From now on `newLine` breaks no line.
+    void keepToOneLine() { keepsToOneLine_ = true; }
     /// Behind all.
     JsonWriter& endLine()
     {
@@ -74,6 +77,13 @@ public:
     JsonWriter& member(const auto& name, const Value& value)
     {
         return key(name).write(value);
+    }
+
+    /// The member, unless the value is none: what is not known has no key.
+    template <class Value>
+    JsonWriter& knownMember(const auto& name, const Value& value)
+    {
+        return isNone(value) ? *this : member(name, value);
     }
 
     /// Bytes that are not UTF-8 become U+FFFD; what could not be seen is escaped.
@@ -116,6 +126,15 @@ public:
     JsonWriter& writeJson(std::string_view json) { return append(json); }
 
 private:
+    template <class Value>
+    static bool isNone(const std::optional<Value>& value)
+    {
+        return !value;
+    }
+    static bool isNone(const std::string& text) { return text.empty(); }
+    static bool isNone(std::floating_point auto value) { return !std::isfinite(value); }
+    static bool isNone(const platform::Value& value) { return value.isNull(); }
+
     /// Where the next `size` bytes go.
     char* room(std::size_t size)
     {
@@ -180,5 +199,6 @@ private:
     fmt::memory_buffer ownBuffer_;
     fmt::memory_buffer& buffer_; // its own, or that of the output
     Output* output_ = nullptr;
+    bool keepsToOneLine_ = false;
     bool isFirst_ = true; // no comma is needed ahead of what comes next
 };

@@ -8,7 +8,7 @@
 
 Form outputForm(const OutputOptions& options)
 {
-    if (options.json)
+    if (options.wantsJson())
         return Form::json;
     if (options.quiet)
         return Form::none;

@@ -9,11 +9,16 @@
 #include <string>
 #include <string_view>
 
+/// What is asked for with --json and --jsonl.
+enum class JsonShape { none, array, lines };
+
 /// The options that every verb takes.
 struct OutputOptions {
-    bool json = false;
+    JsonShape json = JsonShape::none;
     bool quiet = false;
     ColorMode color = ColorMode::automatic;
+
+    bool wantsJson() const { return json != JsonShape::none; }
 };
 
 /// How results are written: for people, for scripts by line or as JSON, or not at all.

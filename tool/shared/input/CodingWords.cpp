@@ -1,4 +1,4 @@
-#include "tool/info/CodingWords.h"
+#include "tool/shared/input/CodingWords.h"
 
 #include "media/containers/ContainerHeaders.h"
 

@@ -1,0 +1,74 @@
+#include "tool/shared/input/FileArguments.h"
+
+#include "platform/OwnedDescriptor.h"
+#include "tool/shared/arguments/UsageError.h"
+#include "tool/shared/input/FolderWalk.h"
+#include "tool/shared/output/Failure.h"
+
+#include <array>
+#include <cerrno>
+#include <fcntl.h>
+#include <string_view>
+#include <unistd.h>
+
+namespace {
+
+// A list may come from a pipe that never ends a line: no path is that long.
+constexpr std::size_t kLongestName = 1 << 16;
+
+void addName(std::vector<std::string>& names, std::string_view name)
+{
+    if (name.size() > kLongestName)
+        throw Failure("is no list of files: a name has more than 65536 bytes");
+    if (!name.empty())
+        names.emplace_back(name);
+}
+
+void addListed(std::vector<std::string>& names, int descriptor, char separator)
+{
+    std::array<char, 1 << 16> piece;
+    std::string begun; // a name whose end has not come
+    for (;;) {
+        const ssize_t got = ::read(descriptor, piece.data(), piece.size());
+        if (got < 0 && errno == EINTR)
+            continue;
+        if (got < 0)
+            throw Failure(errno == EISDIR ? "is a folder, not a list of files" : systemErrorText(errno));
+        if (got == 0)
+            break;
+        std::string_view rest(piece.data(), static_cast<std::size_t>(got));
+        for (std::size_t end = rest.find(separator); end != rest.npos; end = rest.find(separator)) {
+            addName(names, begun.append(rest.substr(0, end)));
+            begun.clear();
+            rest.remove_prefix(end + 1);
+        }
+        if (begun.append(rest).size() > kLongestName)
+            addName(names, begun);
+    }
+    addName(names, begun);
+}
+
+} // namespace
+
+bool FileArguments::maybeSeveral() const
+{
+    return names.size() != 1 || !list.empty() || isFolder(names.front());
+}
+
+std::vector<std::string> allNames(const FileArguments& files)
+{
+    if (files.names.empty() && files.list.empty())
+        throw MissingArgument(files.label);
+    std::vector<std::string> names = files.names;
+    if (files.list.empty())
+        return names;
+    const bool fromInput = files.list == "-";
+    const platform::OwnedDescriptor opened(fromInput ? -1
+                                                     : ::open(files.list.c_str(), O_RDONLY | O_NOCTTY | O_CLOEXEC));
+    if (!fromInput && !opened)
+        throw Failure(systemErrorText(errno));
+    addListed(names, fromInput ? STDIN_FILENO : opened.get(), files.isNulSeparated ? '\0' : '\n');
+    if (names.size() == files.names.size())
+        throw Failure("names no file");
+    return names;
+}

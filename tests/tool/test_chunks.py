@@ -20,11 +20,10 @@ class List(CommandTest):
                       [("desc", 8, 32), ("info", 52, 4), ("data", 68, 204)]),
         }
         for name, (content, container, end, chunks) in cases.items():
-            word = {"FORM": "AIFF", "caff": "CAF", "RIFF": "WAVE"}.get(container, container)
             self.write(name, content)
             with self.subTest(name):
                 self.assertEqual(self.record("chunks", name), {
-                    "path": name, "container": container, "containerName": word, "containerEnd": end, "fileLength": len(content),
+                    "path": name, "container": container, "containerEnd": end, "fileLength": len(content),
                     "chunks": [dict(zip(("id", "offset", "size"), item)) for item in chunks]})
                 self.assertEqual(self.lines("chunks", name), ["\t".join(map(str, item)) for item in chunks])
         self.assertEqual(self.lines("chunks", "b.wav", "c.aiff")[0], "b.wav\tds64\t12\t28")

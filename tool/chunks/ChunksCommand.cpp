@@ -2,7 +2,6 @@
 
 #include "tool/shared/access/FileAccess.h"
 #include "tool/shared/arguments/CommandLine.h"
-#include "tool/shared/input/CodingWords.h"
 #include "tool/shared/input/FileByFile.h"
 #include "tool/shared/input/InputFile.h"
 #include "tool/shared/output/Failure.h"
@@ -27,15 +26,13 @@ public:
     {
     }
 
-    /// `containerName` is what people call it.
-    void begin(const ContainerExtent& extent, const std::string& containerName)
+    void begin(const ContainerExtent& extent)
     {
         extent_ = extent;
         if (form_ == Form::json) {
             JsonWriter& json = json_.begin();
             json.beginObject();
             json.member("path", path_).member("container", fourCCText(extent.id));
-            json.member("containerName", containerName);
             json.member("containerEnd", extent.end).member("fileLength", extent.fileLength);
             json.key("chunks").beginArray();
             list_ = &json;
@@ -108,14 +105,14 @@ std::string listFile(const std::string& path, ChunkListWriter& writer, bool quie
     const std::int32_t status = file.ForEachChunk(
         [&](const ChunkEntry& chunk) {
             if (!std::exchange(begun, true))
-                writer.begin(extent, containerWord(file.Info()));
+                writer.begin(extent);
             return writer.add(chunk);
         },
         &extent);
     if (status != kStatusOK && !begun)
         throw Failure("its container header cannot be read");
     if (!begun)
-        writer.begin(extent, containerWord(file.Info()));
+        writer.begin(extent);
     const std::string error = status != kStatusOK ? "a chunk header cannot be read" : "";
     writer.end(error);
     return error;

@@ -52,9 +52,9 @@ class Info(CommandTest):
         self.assertEqual(self.failure("info", "a.aac"), "ktfiles: a.aac: AAC in ADIF: no audio that can be decoded\n")
         # What the library finds by itself needs no module; for the rest the message names what does.
         plain = self.without_decoders()
-        for name in ("a.mp3", "a.m4a", "a.flac"):
+        for name in ("a.mp3", "a.m4a", "a.flac", "a.ogg"):
             self.assertEqual(self.lines("info", name, env=plain), self.lines("info", name))
-        self.assertIn("install libktfiles-ffmpeg", self.failure("info", "a.ogg", env=plain))
+        self.assertIn("install libktfiles-ffmpeg", self.failure("info", self.encoded("a.wma"), env=plain))
 
     def test_what_counts_and_what_is_missing(self):
         def extensible(valid):

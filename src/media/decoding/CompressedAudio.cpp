@@ -147,14 +147,11 @@ std::int32_t describePackets(const URL& url, CompressedAudio& audio)
     return kStatusOK;
 }
 
-std::int32_t describeCompressedAudio(const URL& url, BytesView start, CompressedAudio& audio)
+std::int32_t describeByDecoding(const URL& url, FourCC fileType, CompressedAudio& audio)
 {
-    std::int32_t status = describePackets(url, audio);
-    if (status != AudioHandle::kFormatNotSupported)
-        return status;
-    audio.fileType = fileTypeOf(startBehindTags(url, start));
-    if (audio.fileType == 0)
-        return kStatusParameterError;
+    audio = {};
+    audio.fileType = fileType;
+    std::int32_t status = kStatusOK;
     const auto reader = ConvertingReader::open(url, &status);
     if (reader) {
         if (const FourCC type = typeOfOpenFile(*reader); type != 0)
@@ -166,6 +163,18 @@ std::int32_t describeCompressedAudio(const URL& url, BytesView start, Compressed
         audio.facts = reader->facts();
     }
     return status;
+}
+
+std::int32_t describeCompressedAudio(const URL& url, BytesView start, CompressedAudio& audio)
+{
+    const std::int32_t asPackets = describePackets(url, audio);
+    if (asPackets != AudioHandle::kFormatNotSupported)
+        return asPackets;
+    const FourCC fileType = fileTypeOf(startBehindTags(url, start));
+    if (fileType == 0)
+        return kStatusParameterError;
+    const std::int32_t byEnds = describeByEnds(url.posixPath(), fileType, audio);
+    return byEnds != AudioHandle::kFormatNotSupported ? byEnds : describeByDecoding(url, fileType, audio);
 }
 
 } // namespace platform

@@ -1,5 +1,6 @@
 #include "media/packets/FLACInfo.h"
 
+#include "media/packets/HighFirstCRC.h"
 #include "platform/core/ByteReader.h"
 #include "platform/core/Packed.h"
 #include "platform/core/Status.h"
@@ -15,29 +16,65 @@ namespace platform {
 
 namespace {
 
-/// The remainder of a division by a polynomial of `width` bits, the highest bit first (RFC 9639, 9.1.8 and 9.3).
-template <unsigned width, std::uint32_t polynomial>
-std::uint32_t checksum(BytesView bytes)
+/// The mask in a comment that names the speakers of channels which are not the usual ones; 0 without it.
+std::uint32_t speakersOfComments(BytesView comments)
 {
-    static constexpr auto table = [] {
-        std::array<std::uint32_t, 256> made{};
-        for (std::uint32_t value = 0; value < made.size(); ++value) {
-            std::uint32_t crc = value << (width - 8);
-            for (int bit = 0; bit < 8; ++bit)
-                crc = crc << 1 ^ ((crc >> (width - 1) & 1) != 0 ? polynomial : 0);
-            made[value] = crc & ((1U << width) - 1);
-        }
-        return made;
-    }();
-    std::uint32_t crc = 0;
-    for (const std::byte byte : bytes)
-        crc = (crc << 8 ^ table[(crc >> (width - 8) ^ std::to_integer<std::uint32_t>(byte)) & 0xFF]) &
-              ((1U << width) - 1);
-    return crc;
+    constexpr std::string_view key = "WAVEFORMATEXTENSIBLE_CHANNEL_MASK=0x";
+    const auto lower = [](char c) { return c >= 'A' && c <= 'Z' ? static_cast<char>(c + ('a' - 'A')) : c; };
+    const auto isSameLetter = [&](char a, char b) { return lower(a) == lower(b); };
+    ByteReader reader(comments, std::endian::little);
+    reader.skip(reader.read<std::uint32_t>()); // the encoder's name
+    for (auto count = reader.read<std::uint32_t>(); count > 0 && reader.ok(); --count) {
+        const std::string_view comment = textOf(reader.take(reader.read<std::uint32_t>()));
+        const bool isKey =
+            comment.size() > key.size() && std::equal(key.begin(), key.end(), comment.begin(), isSameLetter);
+        std::uint32_t mask = 0;
+        if (isKey)
+            std::from_chars(comment.data() + key.size(), comment.data() + comment.size(), mask, 16);
+        if (mask != 0)
+            return mask;
+    }
+    return 0;
 }
 
-/// The number behind the last sample of the frame that begins here; none when no frame does.
-std::optional<std::uint64_t> endOfFrame(BytesView bytes, std::uint32_t blockSize)
+/// Which speakers the file's channels feed: the usual ones of so many, if no comment says otherwise.
+std::uint32_t speakersOfFLAC(HeaderWindow& file, std::uint32_t channels)
+{
+    constexpr int mostBlocks = 64;
+    constexpr std::uint32_t commentsType = 4, most = 1 << 16;
+    std::array<std::byte, 4> header;
+    std::uint64_t position = 4;
+    bool isLast = channels <= 2;
+    for (int i = 0; i < mostBlocks && !isLast; ++i) {
+        if (!file.get(header, position))
+            break;
+        const auto fields = loadBE<std::uint32_t>(header.data());
+        const std::uint32_t size = fields & 0xFFFFFF;
+        isLast = fields >> 31 != 0;
+        if ((fields >> 24 & 0x7F) == commentsType && size <= most) {
+            Bytes comments(size);
+            comments.resize(file.readSome(comments.data(), position + header.size(), size));
+            if (const std::uint32_t mask = speakersOfComments(comments); mask != 0)
+                return mask;
+        }
+        position += header.size() + size;
+    }
+    return usualSpeakersOfFLAC(channels);
+}
+
+/// As many as a frame has at most, where the file says so.
+Bytes lastBytes(HeaderWindow& file, std::uint32_t largestFrame)
+{
+    constexpr std::uint32_t usual = 1 << 15, most = 1 << 18;
+    const std::uint32_t wanted = std::min(largestFrame == 0 ? usual : largestFrame, most);
+    Bytes bytes(static_cast<std::size_t>(std::min<std::uint64_t>(wanted, file.length())));
+    bytes.resize(file.readSome(bytes.data(), file.length() - bytes.size(), bytes.size()));
+    return bytes;
+}
+
+} // namespace
+
+std::optional<FLACFrame> parseFLACFrame(BytesView bytes, std::uint32_t blockSize)
 {
     constexpr std::size_t kMostHeader = 16, kFixedSize = 4;
     bytes = bytes.first(std::min(bytes.size(), kMostHeader));
@@ -68,70 +105,11 @@ std::optional<std::uint64_t> endOfFrame(BytesView bytes, std::uint32_t blockSize
                                : code == 7 ? loadBE<std::uint16_t>(bytes.data() + at) + 1U
                                            : 1U << code;
     at += sizeBytes + rateBytes;
-    if (checksum<8, 0x07>(bytes.first(at)) != std::to_integer<std::uint32_t>(bytes[at]))
+    if (highFirstCRC<8, 0x07>(bytes.first(at)) != std::to_integer<std::uint32_t>(bytes[at]))
         return {};
     const bool countsSamples = (fixed >> 16 & 1) != 0;
-    return (countsSamples ? number : number * blockSize) + size;
+    return FLACFrame{countsSamples ? number : number * blockSize, size};
 }
-
-/// The mask in a comment that names the speakers of channels which are not the usual ones; 0 without it.
-std::uint32_t speakersOfComments(BytesView comments)
-{
-    constexpr std::string_view key = "WAVEFORMATEXTENSIBLE_CHANNEL_MASK=0x";
-    const auto lower = [](char c) { return c >= 'A' && c <= 'Z' ? static_cast<char>(c + ('a' - 'A')) : c; };
-    const auto isSameLetter = [&](char a, char b) { return lower(a) == lower(b); };
-    ByteReader reader(comments, std::endian::little);
-    reader.skip(reader.read<std::uint32_t>()); // the encoder's name
-    for (auto count = reader.read<std::uint32_t>(); count > 0 && reader.ok(); --count) {
-        const std::string_view comment = textOf(reader.take(reader.read<std::uint32_t>()));
-        const bool isKey =
-            comment.size() > key.size() && std::equal(key.begin(), key.end(), comment.begin(), isSameLetter);
-        std::uint32_t mask = 0;
-        if (isKey)
-            std::from_chars(comment.data() + key.size(), comment.data() + comment.size(), mask, 16);
-        if (mask != 0)
-            return mask;
-    }
-    return 0;
-}
-
-/// Which speakers FLAC's channels feed: the usual ones of so many, if no comment says otherwise.
-std::uint32_t speakersOfFLAC(HeaderWindow& file, std::uint32_t channels)
-{
-    constexpr std::array<std::uint32_t, 9> usual{0, 0x4, 0x3, 0x7, 0x33, 0x607, 0x60F, 0x70F, 0x63F};
-    constexpr int mostBlocks = 64;
-    constexpr std::uint32_t commentsType = 4, most = 1 << 16;
-    std::array<std::byte, 4> header;
-    std::uint64_t position = 4;
-    bool isLast = channels <= 2;
-    for (int i = 0; i < mostBlocks && !isLast; ++i) {
-        if (!file.get(header, position))
-            break;
-        const auto fields = loadBE<std::uint32_t>(header.data());
-        const std::uint32_t size = fields & 0xFFFFFF;
-        isLast = fields >> 31 != 0;
-        if ((fields >> 24 & 0x7F) == commentsType && size <= most) {
-            Bytes comments(size);
-            comments.resize(file.readSome(comments.data(), position + header.size(), size));
-            if (const std::uint32_t mask = speakersOfComments(comments); mask != 0)
-                return mask;
-        }
-        position += header.size() + size;
-    }
-    return usual[channels];
-}
-
-/// As many as a frame has at most, where the file says so.
-Bytes lastBytes(HeaderWindow& file, std::uint32_t largestFrame)
-{
-    constexpr std::uint32_t usual = 1 << 15, most = 1 << 18;
-    const std::uint32_t wanted = std::min(largestFrame == 0 ? usual : largestFrame, most);
-    Bytes bytes(static_cast<std::size_t>(std::min<std::uint64_t>(wanted, file.length())));
-    bytes.resize(file.readSome(bytes.data(), file.length() - bytes.size(), bytes.size()));
-    return bytes;
-}
-
-} // namespace
 
 bool flacEndsAt(BytesView tail, std::uint64_t samples, std::uint32_t blockSize)
 {
@@ -140,35 +118,52 @@ bool flacEndsAt(BytesView tail, std::uint64_t samples, std::uint32_t blockSize)
         const BytesView rest = tail.subspan(at);
         if (rest[0] != std::byte{0xFF} || rest.size() < kSmallestFrame)
             continue;
-        const auto end = endOfFrame(rest, blockSize);
-        if (end == samples && checksum<16, 0x8005>(rest) == 0) // with its own checksum behind it
+        const auto frame = parseFLACFrame(rest, blockSize);
+        if (frame && frame->first + frame->samples == samples &&
+            highFirstCRC<16, 0x8005>(rest) == 0) // with its own checksum behind it
             return true;
     }
     return false;
 }
 
+std::uint32_t usualSpeakersOfFLAC(std::uint32_t channels)
+{
+    constexpr std::array<std::uint32_t, 9> usual{0, 0x4, 0x3, 0x7, 0x33, 0x607, 0x60F, 0x70F, 0x63F};
+    return channels < usual.size() ? usual[channels] : 0;
+}
+
+FLACProperties readFLACProperties(BytesView bytes)
+{
+    // Bits: smallest and largest block 16 each, smallest and largest frame 24 each, 20 rate, 3 channels - 1, 5 of a
+    // sample - 1, 36 frames.
+    FLACProperties properties;
+    properties.mostInBlock = loadBE<std::uint16_t>(bytes.data() + 2);
+    properties.largestFrame = loadBE<std::uint32_t>(bytes.data() + 6) & 0xFFFFFF;
+    const auto rest = loadBE<std::uint64_t>(bytes.data() + 10);
+    properties.samples = rest & 0xFFFFFFFFF;
+    properties.format.formatId = fourCC("flac");
+    properties.format.sampleRate = static_cast<double>(rest >> 44);
+    properties.format.channelsPerFrame = static_cast<std::uint32_t>(rest >> 41 & 7) + 1;
+    properties.format.bitsPerChannel = static_cast<std::uint32_t>(rest >> 36 & 31) + 1;
+    return properties;
+}
+
 std::int32_t readFLACInfo(HeaderWindow& file, FLACInfo& info)
 {
-    // Behind the marker, a block header and the smallest number of frames in a block: the largest.
-    constexpr std::uint64_t offset = 10;
+    constexpr std::uint64_t offset = 8;         // behind the marker and a block's header
     constexpr std::uint64_t smallestBlock = 10; // bytes
     info = {};
     info.format.formatId = fourCC("flac");
-    std::array<std::byte, 16> bytes;
+    std::array<std::byte, FLACProperties::kSize> bytes;
     if (!file.get(bytes, offset))
         return file.reason();
-    const std::uint32_t mostInBlock = loadBE<std::uint16_t>(bytes.data());
-    const std::uint32_t largestFrame = loadBE<std::uint32_t>(bytes.data() + 4) & 0xFFFFFF;
-    // Bits: 20 rate, 3 channels - 1, 5 of a sample - 1, 36 frames.
-    const auto properties = loadBE<std::uint64_t>(bytes.data() + 8);
-    const std::uint64_t stated = properties & 0xFFFFFFFFF;
-    info.format.sampleRate = static_cast<double>(properties >> 44);
-    info.format.channelsPerFrame = static_cast<std::uint32_t>(properties >> 41 & 7) + 1;
-    info.format.bitsPerChannel = static_cast<std::uint32_t>(properties >> 36 & 31) + 1;
+    const FLACProperties found = readFLACProperties(bytes);
+    info.format = found.format;
     info.speakers = speakersOfFLAC(file, info.format.channelsPerFrame);
-    info.statedFrames = stated;
-    info.frames = std::min(stated, file.length() / smallestBlock * mostInBlock);
-    info.framesAreStated = stated == 0 || !flacEndsAt(lastBytes(file, largestFrame), stated, mostInBlock);
+    info.statedFrames = found.samples;
+    info.frames = std::min(found.samples, file.length() / smallestBlock * found.mostInBlock);
+    info.framesAreStated =
+        found.samples == 0 || !flacEndsAt(lastBytes(file, found.largestFrame), found.samples, found.mostInBlock);
     return kStatusOK;
 }
 

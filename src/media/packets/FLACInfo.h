@@ -5,7 +5,9 @@
 #include "media/samples/StreamDescription.h"
 #include "platform/core/Bytes.h"
 
+#include <cstddef>
 #include <cstdint>
+#include <optional>
 
 namespace platform {
 
@@ -16,6 +18,28 @@ struct FLACInfo {
     bool framesAreStated = false; // the last frame does not prove them
     std::uint32_t speakers = 0;   // that the channels feed, as bits of WAVE's channel mask
 };
+
+/// What the metadata block "STREAMINFO" says (RFC 9639, 8.2).
+struct FLACProperties {
+    static constexpr std::size_t kSize = 18; // of what is read of it: all but a checksum of the sound
+
+    StreamDescription format;       // "flac"
+    std::uint32_t mostInBlock = 0;  // samples; of every block but the last, where they have one size
+    std::uint32_t largestFrame = 0; // bytes; 0 when it is not known
+    std::uint64_t samples = 0;      // of each channel; 0 when it is not known
+};
+FLACProperties readFLACProperties(BytesView bytes);
+
+/// Which speakers so many channels feed, 1 to 8, when no comment says otherwise.
+std::uint32_t usualSpeakersOfFLAC(std::uint32_t channels);
+
+/// The samples that a frame holds: their number, and that of the first of them.
+struct FLACFrame {
+    std::uint64_t first = 0;
+    std::uint32_t samples = 0;
+};
+/// By the header that the bytes begin with (RFC 9639, 9.1), whose checksum is compared; none when they begin with none.
+std::optional<FLACFrame> parseFLACFrame(BytesView bytes, std::uint32_t blockSize);
 
 /// Of a file that begins with "fLaC". kStatusEndOfFile for one that ends in its header, or the status of a read that
 /// failed.

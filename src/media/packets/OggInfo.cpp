@@ -1,0 +1,177 @@
+#include "media/packets/OggInfo.h"
+
+#include "media/packets/OggCoding.h"
+#include "media/packets/OggPage.h"
+#include "media/packets/RecordRun.h"
+#include "platform/core/Status.h"
+
+namespace platform {
+
+namespace {
+
+class OggEnds {
+public:
+    explicit OggEnds(PacketFile& file) : file_(file) {}
+
+    /// 0, or as describeByEnds.
+    std::int32_t describe(CompressedAudio& audio)
+    {
+        const bool isProven = readHeaders() && readFirstSound() && readLastPages();
+        if (!isProven)
+            return status_ != kStatusOK && status_ != kStatusEndOfFile ? status_ : file_.takeStatus(false);
+        audio.fileType = fourCC("ogg ");
+        audio.format = coding_->format();
+        audio.frames = end_ - coding_->primingFrames();
+        audio.facts = {.speakers = coding_->speakers()};
+        return kStatusOK;
+    }
+
+private:
+    bool nextPage(OggPage& page);
+    bool readHeaders();
+    bool readFirstSound();
+    bool readLastPages();
+    bool isRun(std::span<const OggPage> pages, bool areAll);
+    bool counts(const OggPage& page);
+
+    PacketFile& file_;
+    std::int32_t status_ = kStatusOK;
+    std::uint64_t next_ = 0; // the place of the next page, and its number
+    std::uint32_t number_ = 0;
+    std::uint32_t serial_ = 0;
+    Bytes page_;
+    OggPackets packets_;
+    std::unique_ptr<OggCoding> coding_;
+    std::uint64_t soundStart_ = 0;
+    std::uint64_t granule_ = 0;    // of the last page that counts() was asked about
+    bool isCounted_ = true;        // and it holds
+    std::uint32_t lastFrames_ = 0; // of the last packet on it
+    std::uint64_t end_ = 0;
+};
+
+/// False at the end, and where there is none of the stream, which the next page must be.
+bool OggEnds::nextPage(OggPage& page)
+{
+    const BytesView start = file_.at(next_, OggPage::kHeaderSize + 255);
+    if (start.size() < OggPage::kHeaderSize)
+        return false;
+    std::size_t size = OggPage::kHeaderSize + std::to_integer<std::size_t>(start[OggPage::kHeaderSize - 1]);
+    for (const std::byte segment : start.first(std::min(start.size(), size)).subspan(OggPage::kHeaderSize))
+        size += std::to_integer<std::size_t>(segment);
+    status_ = file_.read(next_, std::min<std::uint64_t>(size, file_.length() - next_), page_);
+    if (status_ != kStatusOK)
+        return false;
+    const auto parsed = OggPage::parse(page_);
+    if (!parsed || parsed->number != number_ || (number_ > 0 && parsed->serial != serial_) ||
+        parsed->isFirst != (number_ == 0))
+        return false;
+    page = *parsed;
+    serial_ = page.serial;
+    ++number_;
+    next_ += page.size();
+    return true;
+}
+
+/// The first page holds the first header and nothing else, and sound begins on a page of its own.
+bool OggEnds::readHeaders()
+{
+    constexpr std::uint64_t most = std::uint64_t{1} << 24; // bytes: there are pictures among the comments
+    OggPage page;
+    const auto takeHeader = [&](BytesView packet) {
+        if (coding_)
+            return !coding_->hasHeaders() && coding_->takeHeader(packet);
+        coding_ = OggCoding::of(packet);
+        return coding_ != nullptr;
+    };
+    while (!coding_ || !coding_->hasHeaders()) {
+        const bool isFirst = number_ == 0;
+        if (next_ > most || !nextPage(page) || page.isLast || !packets_.add(page, takeHeader) ||
+            (isFirst && (!coding_ || packets_.isInsidePacket())))
+            return false;
+    }
+    soundStart_ = next_;
+    return !packets_.isInsidePacket();
+}
+
+/// Whether the page counts what its packets decode to, behind the page ahead; the last one may count less, so that its
+/// last packet is cut. Where the one ahead is not known it only becomes the one that is.
+bool OggEnds::counts(const OggPage& page)
+{
+    std::uint64_t frames = 0;
+    int known = 0;
+    const bool isSound = packets_.add(page, [&](BytesView packet) {
+        const auto ofPacket = coding_->framesOf(packet);
+        const auto first = coding_->firstFrame();
+        if (!ofPacket || (isCounted_ && first && *first != granule_ + frames))
+            return false;
+        frames += *ofPacket;
+        lastFrames_ = *ofPacket > 0 ? *ofPacket : lastFrames_;
+        ++known;
+        return true;
+    });
+    const bool endsPacket = page.endsPacket();
+    if (!isSound || page.isFirst || page.serial != serial_ || endsPacket != (page.granule != OggPage::kNoGranule))
+        return false;
+    if (!endsPacket)
+        return !page.isLast;
+    const std::uint64_t ahead = granule_;
+    granule_ = static_cast<std::uint64_t>(page.granule);
+    if (page.granule < 0 || !isCounted_) {
+        isCounted_ = known > 0;
+        return page.granule >= 0 && !page.isLast;
+    }
+    return page.isLast ? granule_ <= ahead + frames && granule_ > ahead + frames - lastFrames_
+                       : granule_ == ahead + frames;
+}
+
+/// Up to the page that counts it.
+bool OggEnds::readFirstSound()
+{
+    constexpr std::uint64_t most = std::uint64_t{1} << 20;
+    OggPage page;
+    do
+        if (next_ - soundStart_ > most || !nextPage(page) || !counts(page) || (page.isLast && next_ < file_.length()))
+            return false;
+    while (!page.endsPacket());
+    return true;
+}
+
+bool OggEnds::readLastPages()
+{
+    FileTail tail(file_, soundStart_, file_.length());
+    while (tail.grow(status_)) {
+        const std::vector<OggPage> pages = recordsToTheEnd<OggPage>(tail.bytes(), "OggS");
+        if (pages.empty() || !pages.back().isLast || pages.back().granule < 0)
+            return false;
+        const auto last = static_cast<std::uint64_t>(pages.back().granule);
+        const auto found =
+            std::ranges::find_if(pages, [](const OggPage& page) { return page.granule != OggPage::kNoGranule; });
+        const auto first = static_cast<std::uint64_t>(found->granule);
+        if (tail.isAll() || (first < last && last - first > kProvenFrames))
+            return isRun(pages, tail.isAll());
+    }
+    return false;
+}
+
+/// Whether they follow one another to the end of the stream.
+bool OggEnds::isRun(std::span<const OggPage> pages, bool areAll)
+{
+    packets_ = {};
+    coding_->leap();
+    isCounted_ = areAll;
+    granule_ = 0;
+    for (std::size_t i = 0; i < pages.size(); ++i)
+        if (pages[i].number != pages[0].number + i || pages[i].isLast != (i + 1 == pages.size()) || !counts(pages[i]))
+            return false;
+    end_ = granule_;
+    return isCounted_ && !packets_.isInsidePacket() && end_ > coding_->primingFrames();
+}
+
+} // namespace
+
+std::int32_t readOggInfo(PacketFile& file, CompressedAudio& audio)
+{
+    return OggEnds(file).describe(audio);
+}
+
+} // namespace platform

@@ -1,7 +1,8 @@
 // The packet readers on any bytes, with the file in memory: whatever opens has a table that its packets bear out, and
-// packets that lie in the file, which read the same in any order.
+// packets that lie in the file, which read the same in any order. The readers of files by their ends, too.
 #include "MemoryDisk.h"
 
+#include "media/packets/FileEnds.h"
 #include "media/packets/PacketSource.h"
 
 namespace {
@@ -30,6 +31,14 @@ void checkTable(const PacketSource& source)
         check(static_cast<std::uint64_t>(table.validFrames + table.primingFrames + table.remainderFrames) == frames);
 }
 
+void readEnds()
+{
+    CompressedAudio audio;
+    for (const FourCC type : {fourCC("ogg "), fourCC("wvpk"), fourCC("tta "), fourCC("MPG2"), fourCC("ac-3")})
+        if (describeByEnds("/file", type, audio) == 0)
+            check(audio.frames > 0 && audio.format.sampleRate > 0 && audio.format.channelsPerFrame > 0);
+}
+
 } // namespace
 
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size)
@@ -38,6 +47,7 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
         return 0;
     useMemory();
     fileBytes.assign(data, data + size);
+    readEnds();
     std::int32_t status = 0;
     const std::unique_ptr<PacketSource> source = openPacketSource("/file", &status);
     if (!source) {

@@ -378,4 +378,8 @@ INSTANTIATE_TEST_SUITE_P(
                                             {"flac", "flac -8 IN -o OUT"},
                                             {"ogg", "flac --ogg IN -o OUT"},
                                             {"mpc", "mpcenc IN OUT"},
-                                            {"wv", "wavpack -h IN -o OUT"}}));
+                                            {"wv", "wavpack -h IN -o OUT"},
+                                            {"wv", "wavpack -b256 -c IN -o OUT"},
+                                            {"ogg", "ffmpeg -i IN -c:a libvorbis OUT"},
+                                            {"opus", "ffmpeg -i IN -c:a libopus OUT"},
+                                            {"oga", "ffmpeg -i IN -c:a flac OUT"}}));

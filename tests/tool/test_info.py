@@ -52,7 +52,10 @@ class Info(CommandTest):
         self.assertEqual(self.failure("info", "a.aac"), "ktfiles: a.aac: AAC in ADIF: no audio that can be decoded\n")
         # What the library finds by itself needs no module; for the rest the message names what does.
         plain = self.without_decoders()
-        for name in ("a.mp3", "a.m4a", "a.flac", "a.ogg"):
+        proven = ("a.opus", "a.tta", "a.mp2", "a.ac3")
+        for name in proven:
+            self.encoded(name)
+        for name in ("a.mp3", "a.m4a", "a.flac", "a.ogg", *proven):
             self.assertEqual(self.lines("info", name, env=plain), self.lines("info", name))
         self.assertIn("install libktfiles-ffmpeg", self.failure("info", self.encoded("a.wma"), env=plain))
 

@@ -1,7 +1,11 @@
 #include "media/packets/FileEnds.h"
 
 #include "media/containers/AudioHandle.h"
+#include "media/packets/AC3Info.h"
+#include "media/packets/LayerIIInfo.h"
 #include "media/packets/OggInfo.h"
+#include "media/packets/TTAInfo.h"
+#include "media/packets/WavPackInfo.h"
 #include "platform/SystemCalls.h"
 #include "platform/core/Status.h"
 
@@ -16,8 +20,30 @@ struct Kind {
     std::int32_t (*read)(PacketFile& file, CompressedAudio& audio);
 };
 constexpr Kind kKinds[] = {
-    {fourCC("ogg "), readOggInfo},
+    {fourCC("ogg "), readOggInfo}, {fourCC("ac-3"), readAC3Info},     {fourCC("MPG2"), readLayerIIInfo},
+    {fourCC("tta "), readTTAInfo}, {fourCC("wvpk"), readWavPackInfo},
 };
+
+std::int32_t describe(const Kind& kind, const std::string& path, CompressedAudio& audio)
+{
+    FileStatus found;
+    const int descriptor = systemCalls().openFile(path.c_str(), OpenFor::reading, &found);
+    if (descriptor < 0)
+        return PosixErrorToOSErr();
+    PacketFile file(descriptor, static_cast<std::uint64_t>(std::max<std::int64_t>(found.size, 0)));
+    const std::int32_t status = kind.read(file, audio);
+    return status == kStatusOK ? file.takeStatus() : status; // a tag may stand where nothing could be read
+}
+
+/// Whether the file beside it that corrects a lossy one, if there is one, is as whole: of one that is broken no sound
+/// may come.
+bool isCorrected(const Kind& kind, const std::string& path, std::uint64_t frames)
+{
+    CompressedAudio corrections;
+    const std::int32_t status =
+        path.ends_with(".wv") ? describe(kind, path + "c", corrections) : std::int32_t{kStatusFileNotFound};
+    return status == kStatusFileNotFound || (status == kStatusOK && corrections.frames == frames);
+}
 
 } // namespace
 
@@ -26,12 +52,9 @@ std::int32_t describeByEnds(const std::string& path, FourCC fileType, Compressed
     const auto* const kind = std::ranges::find(kKinds, fileType, &Kind::fileType);
     if (kind == std::end(kKinds))
         return AudioHandle::kFormatNotSupported;
-    FileStatus found;
-    const int descriptor = systemCalls().openFile(path.c_str(), OpenFor::reading, &found);
-    if (descriptor < 0)
-        return PosixErrorToOSErr();
-    PacketFile file(descriptor, static_cast<std::uint64_t>(std::max<std::int64_t>(found.size, 0)));
-    return kind->read(file, audio);
+    const std::int32_t status = describe(*kind, path, audio);
+    const bool isKnown = status != kStatusOK || fileType != fourCC("wvpk") || isCorrected(*kind, path, audio.frames);
+    return isKnown ? status : std::int32_t{AudioHandle::kFormatNotSupported};
 }
 
 } // namespace platform

@@ -2,12 +2,43 @@
 
 #include "media/packets/OggCoding.h"
 #include "media/packets/OggPage.h"
-#include "media/packets/RecordRun.h"
 #include "platform/core/Status.h"
+
+#include <algorithm>
 
 namespace platform {
 
 namespace {
+
+/// The last bytes of a stretch of a file, as many as are needed.
+class FileTail {
+public:
+    /// Of the file from `start` to `end`. Does not own it.
+    FileTail(PacketFile& file, std::uint64_t start, std::uint64_t end) : file_(file), start_(start), end_(end) {}
+
+    /// Reads so many bytes, then always twice as many; false when all were read before, when they are too many, and
+    /// when they cannot be read, with the status.
+    bool grow(std::int32_t& status)
+    {
+        constexpr std::size_t first = std::size_t{1} << 17, most = std::size_t{1} << 23;
+        const std::uint64_t all = end_ - start_;
+        if (bytes_.size() == all || bytes_.size() >= most)
+            return false;
+        status = file_.read(end_ - std::min<std::uint64_t>(all, std::max(first, 2 * bytes_.size())),
+                            std::min<std::uint64_t>(all, std::max(first, 2 * bytes_.size())), bytes_);
+        return status == 0;
+    }
+    BytesView bytes() const { return bytes_; }
+    bool isAll() const { return bytes_.size() == end_ - start_; }
+
+private:
+    PacketFile& file_;
+    std::uint64_t start_, end_;
+    Bytes bytes_;
+};
+
+/// More than any coding makes of one; a stream of others has been put together.
+constexpr std::uint64_t kMostFramesPerByte = 8192;
 
 class OggEnds {
 public:
@@ -43,9 +74,8 @@ private:
     OggPackets packets_;
     std::unique_ptr<OggCoding> coding_;
     std::uint64_t soundStart_ = 0;
-    std::uint64_t granule_ = 0;    // of the last page that counts() was asked about
-    bool isCounted_ = true;        // and it holds
-    std::uint32_t lastFrames_ = 0; // of the last packet on it
+    std::uint64_t granule_ = 0; // of the last page that counts() was asked about
+    bool isCounted_ = true;     // and it holds
     std::uint64_t end_ = 0;
 };
 
@@ -85,7 +115,7 @@ bool OggEnds::readHeaders()
     };
     while (!coding_ || !coding_->hasHeaders()) {
         const bool isFirst = number_ == 0;
-        if (next_ > most || !nextPage(page) || page.isLast || !packets_.add(page, takeHeader) ||
+        if (next_ > most || !nextPage(page) || page.isLast || page.granule > 0 || !packets_.add(page, takeHeader) ||
             (isFirst && (!coding_ || packets_.isInsidePacket())))
             return false;
     }
@@ -97,7 +127,7 @@ bool OggEnds::readHeaders()
 /// last packet is cut. Where the one ahead is not known it only becomes the one that is.
 bool OggEnds::counts(const OggPage& page)
 {
-    std::uint64_t frames = 0;
+    std::uint64_t frames = 0, lastOnPage = 0;
     int known = 0;
     const bool isSound = packets_.add(page, [&](BytesView packet) {
         const auto ofPacket = coding_->framesOf(packet);
@@ -105,7 +135,7 @@ bool OggEnds::counts(const OggPage& page)
         if (!ofPacket || (isCounted_ && first && *first != granule_ + frames))
             return false;
         frames += *ofPacket;
-        lastFrames_ = *ofPacket > 0 ? *ofPacket : lastFrames_;
+        lastOnPage = *ofPacket > 0 ? *ofPacket : lastOnPage;
         ++known;
         return true;
     });
@@ -120,8 +150,8 @@ bool OggEnds::counts(const OggPage& page)
         isCounted_ = known > 0;
         return page.granule >= 0 && !page.isLast;
     }
-    return page.isLast ? granule_ <= ahead + frames && granule_ > ahead + frames - lastFrames_
-                       : granule_ == ahead + frames;
+    const std::uint64_t all = ahead + frames;
+    return granule_ == all || (page.isLast && granule_ < all && granule_ + lastOnPage > all);
 }
 
 /// Up to the page that counts it.
@@ -140,7 +170,7 @@ bool OggEnds::readLastPages()
 {
     FileTail tail(file_, soundStart_, file_.length());
     while (tail.grow(status_)) {
-        const std::vector<OggPage> pages = recordsToTheEnd<OggPage>(tail.bytes(), "OggS");
+        const std::vector<OggPage> pages = lastOggPages(tail.bytes());
         if (pages.empty() || !pages.back().isLast || pages.back().granule < 0)
             return false;
         const auto last = static_cast<std::uint64_t>(pages.back().granule);
@@ -164,7 +194,8 @@ bool OggEnds::isRun(std::span<const OggPage> pages, bool areAll)
         if (pages[i].number != pages[0].number + i || pages[i].isLast != (i + 1 == pages.size()) || !counts(pages[i]))
             return false;
     end_ = granule_;
-    return isCounted_ && !packets_.isInsidePacket() && end_ > coding_->primingFrames();
+    return isCounted_ && !packets_.isInsidePacket() && end_ > coding_->primingFrames() &&
+           end_ / kMostFramesPerByte <= file_.length();
 }
 
 } // namespace

@@ -58,6 +58,26 @@ bool OggPage::endsPacket() const
     return false;
 }
 
+std::vector<OggPage> lastOggPages(BytesView bytes)
+{
+    constexpr std::string_view marker = "OggS";
+    constexpr int mostTries = 3; // a marker that begins no page stands by chance in a file of gigabytes, or on purpose
+    std::vector<OggPage> pages;
+    for (int tries = 0; tries < mostTries && pages.empty(); ++tries) {
+        const std::size_t at = textOf(bytes).find(marker);
+        if (at == std::string_view::npos)
+            return {};
+        bytes = bytes.subspan(at);
+        while (const std::optional<OggPage> page = OggPage::parse(bytes)) {
+            pages.push_back(*page);
+            bytes = bytes.subspan(page->size());
+        }
+        if (pages.empty())
+            bytes = bytes.subspan(marker.size());
+    }
+    return bytes.empty() ? pages : std::vector<OggPage>();
+}
+
 bool OggPackets::add(const OggPage& page, const Visit& visit)
 {
     if (isStart_ && page.isContinued) {

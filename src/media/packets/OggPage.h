@@ -7,6 +7,7 @@
 #include <cstdint>
 #include <functional>
 #include <optional>
+#include <vector>
 
 namespace platform {
 
@@ -30,6 +31,10 @@ struct OggPage {
     std::size_t size() const { return kHeaderSize + lacing.size() + body.size(); }
     bool endsPacket() const;
 };
+
+/// The last pages of the bytes, from the first one that is whole on to the one that ends with them. Empty when there
+/// are none, or something else stands among or behind them.
+std::vector<OggPage> lastOggPages(BytesView bytes);
 
 /// Joins the packets of pages that follow one another.
 class OggPackets {

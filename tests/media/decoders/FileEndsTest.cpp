@@ -65,7 +65,7 @@ protected:
         const std::string name = std::to_string(channels) + GetParam().name;
         for (const auto& [what, with] : {std::pair("IN", std::string("IN.wav")), std::pair("OUT", name)})
             command.replace(command.find(what), std::string_view(what).size(), with);
-        return runs(folder_, command) ? folder_ / name : "";
+        return runs(folder_, command) && std::filesystem::exists(folder_ / name) ? folder_ / name : "";
     }
     TemporaryFolder folder_;
 };
@@ -142,7 +142,7 @@ TEST_P(FileEnds, tellOfReadsThatFail)
             faults.fail(Call::pread, EIO, failing);
         const std::int32_t status = describeByEnds(path, GetParam().type, audio);
         EXPECT_EQ(status, failing > 0 ? kStatusIOError : kStatusOK) << failing;
-        calls = std::max(calls, faults.calls(Call::pread));
+        calls = failing == 0 ? faults.calls(Call::pread) : calls;
     }
     EXPECT_GT(calls, 1);
 }
@@ -154,7 +154,15 @@ INSTANTIATE_TEST_SUITE_P(Programs, FileEnds,
                                            Making{"opusenc --framesize 60 IN OUT", "b.opus", fourCC("ogg ")},
                                            Making{"ffmpeg -i IN -c:a libopus OUT", "c.opus", fourCC("ogg ")},
                                            Making{"flac --ogg IN -o OUT", "a.oga", fourCC("ogg ")},
-                                           Making{"ffmpeg -i IN -c:a flac OUT", "b.oga", fourCC("ogg ")}));
+                                           Making{"ffmpeg -i IN -c:a flac OUT", "b.oga", fourCC("ogg ")},
+                                           Making{"wavpack -h IN -o OUT", "a.wv", fourCC("wvpk")},
+                                           Making{"wavpack -m -w Title=a IN -o OUT", "b.wv", fourCC("wvpk")},
+                                           Making{"wavpack -b256 IN -o OUT", "c.wv", fourCC("wvpk")},
+                                           Making{"ffmpeg -i IN OUT", "a.tta", fourCC("tta ")},
+                                           Making{"ffmpeg -i IN -c:a mp2 OUT", "a.mp2", fourCC("MPG2")},
+                                           Making{"twolame -v IN OUT", "b.mp2", fourCC("MPG2")},
+                                           Making{"ffmpeg -i IN -ar 48000 OUT", "a.ac3", fourCC("ac-3")},
+                                           Making{"ffmpeg -i IN -ar 44100 OUT", "b.ac3", fourCC("ac-3")}));
 
 TEST(FileEndsOfOgg, areInDoubtWhereThereAreSeveralStreams)
 {
@@ -165,4 +173,45 @@ TEST(FileEndsOfOgg, areInDoubtWhereThereAreSeveralStreams)
     EXPECT_TRUE(isProven(folder / "a.ogg", fourCC("ogg ")));
     EXPECT_FALSE(isProven(folder / "chained.ogg", fourCC("ogg ")));
     EXPECT_FALSE(isProven(folder / "two.ogg", fourCC("ogg ")));
+}
+
+TEST(FileEndsOfWavPack, askWhatCorrectsThem)
+{
+    const TemporaryFolder folder;
+    writeSound(folder / "IN.wav", 220501, 2, 44100, 16);
+    ASSERT_TRUE(runs(folder, "wavpack -c -b256 IN.wav -o a.wv"));
+    EXPECT_TRUE(isProven(folder / "a.wv", fourCC("wvpk")));
+    const Bytes corrections = readFile(folder / "a.wvc");
+    std::minstd_rand random(3);
+    int proven = 0;
+    for (int i = 0; i < 16; ++i) {
+        SCOPED_TRACE(i);
+        Bytes mutant = corrections;
+        mutant[random() % mutant.size()] ^= std::byte{0x10};
+        mutant.resize(i % 4 == 0 ? mutant.size() / 2 : mutant.size());
+        std::ignore = folder.write("a.wvc", mutant);
+        proven += isProven(folder / "a.wv", fourCC("wvpk")) ? 1 : 0;
+    }
+    EXPECT_LT(proven, 13); // no half of a file
+}
+
+TEST(FileEndsOfTTA, standBetweenTags)
+{
+    const TemporaryFolder folder;
+    writeSound(folder / "IN.wav", 100000, 2, 44100, 16);
+    ASSERT_TRUE(runs(folder, "ffmpeg -i IN.wav a.tta && { printf 'ID3\\003\\0\\0\\0\\0\\0\\012'; head -c 10 /dev/zero; "
+                             "cat a.tta; printf TAG; head -c 125 /dev/zero; } > tagged.tta"));
+    EXPECT_TRUE(isProven(folder / "tagged.tta", fourCC("tta ")));
+}
+
+// As decoders have it, which look for a second frame that is like the first.
+TEST(FileEndsOfLayerII, areInDoubtWhereTheFirstFramesDiffer)
+{
+    const TemporaryFolder folder;
+    writeSound(folder / "IN.wav", 100000, 2, 44100, 16);
+    ASSERT_TRUE(runs(folder, "twolame -b 192 IN.wav a.mp2"));
+    Bytes content = readFile(folder / "a.mp2");
+    ASSERT_TRUE(isProven(folder / "a.mp2", fourCC("MPG2")));
+    content[3] ^= std::byte{0x80}; // the mode
+    EXPECT_FALSE(isProven(folder.write("b.mp2", content), fourCC("MPG2")));
 }

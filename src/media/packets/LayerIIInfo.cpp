@@ -1,0 +1,78 @@
+#include "media/packets/LayerIIInfo.h"
+
+#include "platform/core/Packed.h"
+#include "platform/core/Status.h"
+
+#include <array>
+
+namespace platform {
+
+namespace {
+
+constexpr std::size_t kHeaderSize = 4;
+constexpr std::uint32_t kFramesInOne = 1152;
+
+// Bits: sync 12, MPEG-1 1, layer 2, no CRC 1, bit rate 4, sample rate 2, padding 1, private 1, mode 2, …, emphasis 2
+constexpr std::uint32_t kLayerMask = 0xFFF60000, kLayerII = 0xFFF40000;
+constexpr std::uint32_t kKindMask = 0xFFFE0C00; // sync, version, layer, sample rate
+// And mode, copyright, original, emphasis: a demultiplexer that looks for a stream skips a first frame that has not
+// these in common with the second.
+constexpr std::uint32_t kStartMask = 0xFFFE0CCF;
+
+bool isMono(std::uint32_t header)
+{
+    return (header >> 6 & 3) == 3;
+}
+
+/// 0 when the value is reserved.
+std::uint32_t sampleRateOf(std::uint32_t header)
+{
+    constexpr std::array<std::uint32_t, 4> rates{44100, 48000, 32000, 0};
+    const bool isMPEG1 = (header >> 19 & 1) != 0;
+    return rates[header >> 10 & 3] / (isMPEG1 ? 1 : 2);
+}
+
+/// In bytes; 0 when it is no frame of the layer.
+std::uint32_t frameSize(std::uint32_t header)
+{
+    // By the index in the header, in kilobits per second: of MPEG-2 at half the rates, then of MPEG-1.
+    constexpr std::array<std::array<std::uint16_t, 16>, 2> bitRates{
+        {{0, 8, 16, 24, 32, 40, 48, 56, 64, 80, 96, 112, 128, 144, 160, 0},
+         {0, 32, 48, 56, 64, 80, 96, 112, 128, 160, 192, 224, 256, 320, 384, 0}}};
+    const std::uint32_t rate = sampleRateOf(header), bitRate = bitRates[header >> 19 & 1][header >> 12 & 15];
+    if ((header & kLayerMask) != kLayerII || rate == 0 || bitRate == 0)
+        return 0;
+    return kFramesInOne / 8 * 1000 * bitRate / rate + (header >> 9 & 1);
+}
+
+} // namespace
+
+std::int32_t readLayerIIInfo(PacketFile& file, CompressedAudio& audio)
+{
+    constexpr std::uint64_t fewest = 16; // frames; others may be taken for something else
+    std::uint32_t first = 0;
+    std::uint64_t count = 0, at = 0;
+    for (; at < file.length(); ++count) {
+        const BytesView bytes = file.at(at, kHeaderSize);
+        const std::uint32_t header = bytes.size() == kHeaderSize ? loadBE<std::uint32_t>(bytes.data()) : 0;
+        const std::uint32_t size = frameSize(header);
+        first = count == 0 ? header : first;
+        const std::uint32_t alike = count == 1 ? kStartMask : kKindMask;
+        if (size == 0 || ((header ^ first) & alike) != 0 || isMono(header) != isMono(first))
+            return file.takeStatus(false);
+        at += size;
+    }
+    if (at != file.length() || count < fewest)
+        return file.takeStatus(false);
+    audio = {};
+    audio.fileType = fourCC("MPG2");
+    audio.format.formatId = fourCC(".mp2");
+    audio.format.sampleRate = sampleRateOf(first);
+    audio.format.channelsPerFrame = isMono(first) ? 1 : 2;
+    audio.format.framesPerPacket = kFramesInOne;
+    audio.frames = count * kFramesInOne;
+    audio.facts.speakers = isMono(first) ? 0x4 : 0x3;
+    return kStatusOK;
+}
+
+} // namespace platform

@@ -1,9 +1,12 @@
 // Containers that are only read: big-endian WAVE, Wave64 and AU, without a decoder module.
 #include "ReaderFrames.h"
+#include "media/containers/ChannelLayouts.h"
 #include "platform/core/ByteWriter.h"
 #include "support/FakeDecoder.h"
 #include "support/Media.h"
 #include "support/URLs.h"
+
+#include <bit>
 
 using namespace platform;
 
@@ -153,4 +156,19 @@ TEST(ContainersToRead, BrokenOnesSaySo)
         EXPECT_FALSE(openReader(folder.write("file", content), &status));
         EXPECT_NE(status, 0);
     }
+}
+
+TEST(ChannelLayouts, HaveASpeakerForEachChannelOfTheirTag)
+{
+    // The low half of a tag counts its channels.
+    constexpr std::uint32_t tags[] = {
+        0x640001, 0x650002, 0x6C0004, 0x6D0005, 0x6E0006, 0x6F0008, 0x710003, 0x720003, 0x730004, 0x740004,
+        0x750005, 0x760005, 0x770005, 0x780005, 0x790006, 0x7A0006, 0x7B0006, 0x7C0006, 0x7D0007, 0x7E0008,
+        0x7F0008, 0x800008, 0x810008, 0x830003, 0x840004, 0x850003, 0x860004, 0x870005, 0x880004, 0x890005,
+    };
+    for (const std::uint32_t tag : tags)
+        EXPECT_EQ(static_cast<std::uint32_t>(std::popcount(speakersOfLayout(tag, 0))), tag & 0xFFFF) << std::hex << tag;
+    EXPECT_EQ(speakersOfLayout(0x790006, 0), 0x3Fu); // 5.1
+    EXPECT_EQ(speakersOfLayout(0x10000, 0x33), 0x33u);
+    EXPECT_EQ(speakersOfLayout(0x6A0002, 0x33), 0u); // binaural
 }

@@ -51,7 +51,7 @@ _ktfiles()
         fi
     elif [[ $cur == -* ]]; then
         case $verb/$object in
-            info/*) COMPREPLY=($(compgen -W "--long $files $common" -- "$cur")) ;;
+            info/*) COMPREPLY=($(compgen -W "--long --check --md5 --sha256 $files $common" -- "$cur")) ;;
             chunks/get) COMPREPLY=($(compgen -W "--output --force --sidecar $common" -- "$cur")) ;;
             chunks/add) COMPREPLY=($(compgen -W "--from --replace --sidecar --force $edit $common" -- "$cur")) ;;
             chunks/remove) COMPREPLY=($(compgen -W "--sidecar --force $edit $common" -- "$cur")) ;;

@@ -6,7 +6,7 @@
 #include <algorithm>
 #include <array>
 
-std::int32_t DigestAudio(CFileIO& file, const AudioFileInfo& info, platform::Digest& digest,
+std::int32_t DigestAudio(CFileIO& file, const AudioFileInfo& info, std::span<platform::Digest* const> digests,
                          const std::function<bool()>& goesOn)
 {
     constexpr std::int64_t blockSize = 1 << 20;
@@ -21,7 +21,8 @@ std::int32_t DigestAudio(CFileIO& file, const AudioFileInfo& info, platform::Dig
         const std::int32_t status = file.Read(block.data(), info.dataOffset + done, count, &got);
         if (status != kStatusOK)
             return status;
-        digest.add(BytesView(block).first(static_cast<std::size_t>(got)));
+        for (platform::Digest* const digest : digests)
+            digest->add(BytesView(block).first(static_cast<std::size_t>(got)));
         done += got;
     }
     return kStatusOK;

@@ -5,12 +5,13 @@
 #include "platform/Digest.h"
 
 #include <functional>
+#include <span>
 
-/// Adds the sample bytes of an open file, [info.dataOffset, info.dataOffset + info.dataSize), to the digest: for MD5 of
-/// a WAVE file what archives keep of its chunk "data". `goesOn`, asked every few MiB, ends the work with
-/// kStatusUserCancelled when it says no. kStatusParameterError for a file whose samples are not known to stand in one
-/// piece (dataSize 0); kStatusEndOfFile for one that became shorter; the status of a read that failed.
-KT_EXPORT std::int32_t DigestAudio(CFileIO& file, const AudioFileInfo& info, platform::Digest& digest,
+/// Adds the sample bytes of an open file, [info.dataOffset, info.dataOffset + info.dataSize), to each of the digests,
+/// in one pass: for MD5 of a WAVE file what archives keep of its chunk "data". `goesOn`, asked every few MiB, ends the
+/// work with kStatusUserCancelled when it says no. kStatusParameterError for a file whose samples are not known to
+/// stand in one piece (dataSize 0); kStatusEndOfFile for one that became shorter; the status of a read that failed.
+KT_EXPORT std::int32_t DigestAudio(CFileIO& file, const AudioFileInfo& info, std::span<platform::Digest* const> digests,
                                    const std::function<bool()>& goesOn = {});
 
 /// The MD5 that a FLAC file states of its sound as it was ahead of the encoder (RFC 9639, section 8.2), 16 bytes; empty

@@ -21,8 +21,8 @@ def name_of(arguments):
     """The schema of what a command line prints."""
     words = [str(argument) for argument in arguments]
     verb, item = words[0], next((word for word in words[1:] if not word.startswith("-")), "")
-    if verb == "adm" and "--check" in words:
-        return "adm-check"
+    if verb in ("adm", "info") and "--check" in words:
+        return f"{verb}-check"
     if verb == "chunks" and item in OBJECTS or verb == "project" and item in OBJECTS:
         return OBJECTS[item]
     if verb == "tags" and item in ("set", "remove", "copy"):

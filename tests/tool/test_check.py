@@ -9,8 +9,9 @@ from command import KTFILES, CommandTest, caf, chunk, needs_decoders, wave
 
 class Check(CommandTest):
     def make(self, *commands):
+        """Not every program has every format."""
         for command in commands:
-            subprocess.run(command, shell=True, check=True, cwd=self.folder, stdout=subprocess.DEVNULL,
+            subprocess.run(command, shell=True, check=False, cwd=self.folder, stdout=subprocess.DEVNULL,
                            stderr=subprocess.DEVNULL, stdin=subprocess.DEVNULL)
 
     @needs_decoders
@@ -48,16 +49,16 @@ class Check(CommandTest):
         self.write("fact.caf", caf((b"info", b"\0\0\0\0"), (b"info", b"\0\0\0\0")))
         result = self.run_command("info", "--check", "good.wav", "cut.wav", "fact.caf", status=1)
         self.assertEqual(result.stdout.decode().splitlines(), [
-            f"cut.wav: 0: RIFF says that it ends at {len(good)}, the file ends at {len(good) - 100}; readers take what is there",
-            f"cut.wav: 36: data says 200 bytes, {len(good) - 144} are there; readers take what is there, or refuse the file",
-            "fact.caf: 68: info stands here again, first at 52; readers take one of them"])
+            f'cut.wav: 0: "RIFF" says that it ends at {len(good)}, the file ends at {len(good) - 100}; readers take what is there',
+            f'cut.wav: 36: "data" says 200 bytes, {len(good) - 144} are there; readers take what is there, or refuse the file',
+            'fact.caf: 68: "info" stands here again, first at 52; readers take one of them'])
         self.assertEqual(result.stderr, b"")
         records = self.json("info", "--check", "good.wav", "cut.wav", status=1)
         self.assertEqual([record["path"] for record in records], ["good.wav", "cut.wav"])
         self.assertEqual(records[0]["findings"], [])
         self.assertEqual([finding["kind"] for finding in records[1]["findings"]], ["containerIsCut", "chunkIsCut"])
         self.assertEqual(records[1]["findings"][1]["offset"], 36)
-        self.assertEqual(records[1]["findings"][1]["chunk"], "data")
+        self.assertEqual(records[1]["findings"][1]["id"], "data")
         # What cannot be read at all is an error as ever.
         self.write("none.wav", b"")
         self.assertEqual(self.failure("info", "--check", "none.wav"), "ktfiles: none.wav: is empty\n")
@@ -84,7 +85,7 @@ class Digests(CommandTest):
     @needs_decoders
     def test_agree_with_flac(self):
         self.encoded("a.wav", "-c:a", "pcm_s16le")
-        subprocess.run(["flac", "-s", "a.wav"], check=True, cwd=self.folder)
+        subprocess.run(["flac", "--totally-silent", "a.wav"], check=True, cwd=self.folder)
         stated = subprocess.run(["metaflac", "--show-md5sum", "a.flac"], check=True, cwd=self.folder, capture_output=True,
                                 text=True).stdout.strip()
         records = self.json("info", "--md5", "a.wav", "a.flac")

@@ -1,4 +1,7 @@
 // ktfiles info: what audio files are.
+#include "audiofile/AudioDigest.h"
+#include "tool/info/FileDescription.h"
+#include "tool/info/InfoCheck.h"
 #include "tool/shared/access/FileAccess.h"
 #include "tool/shared/arguments/CommandLine.h"
 #include "tool/shared/input/CodingWords.h"
@@ -13,43 +16,6 @@
 #include <cmath>
 
 namespace {
-
-/// Of a file that is known, but not decoded here.
-void failAsDecoderDoes(const std::string& path, const std::string& kind)
-{
-    CAudioFileIO audio;
-    openAudio(audio, path);
-    try {
-        requireDecoder(audio);
-    } catch (const Failure& failure) {
-        throw Failure(kind + ": " + failure.what());
-    }
-}
-
-AudioFileInfo describe(const std::string& path, bool quiet)
-{
-    const FileAccess access = accessForReading(path, {.quiet = quiet});
-    CFileIO file;
-    requireOK(file.OpenRead(referenceTo(path), 0));
-    AudioFileInfo info;
-    const std::int32_t status = GetAudioFileInfo(file, 0, info);
-    if (file.GetEOF() == 0)
-        throw OtherKind("is empty", OtherKind::Kind::unknown);
-    if (status == platform::AudioHandle::kFormatNotSupported)
-        failAsDecoderDoes(path, containerWord(info));
-    if (status == kStatusEndOfFile)
-        throw Failure("ends within its header");
-    if (status == kStatusParameterError || (status == kStatusOK && info.containerId == 0))
-        throw OtherKind("no audio file known here", OtherKind::Kind::unknown);
-    requireOK(status);
-    if (info.framesAreStated) { // by a header: the decoder, where there is one, counts
-        CAudioFileIO audio;
-        openAudio(audio, path);
-        audio.OpenDecoder();
-        return audio.Info();
-    }
-    return info;
-}
 
 double durationOf(const AudioFileInfo& info)
 {
@@ -73,15 +39,6 @@ std::string channelsText(const AudioFileInfo& info)
 std::string tracksText(const AudioFileInfo& info)
 {
     return info.audioTracks > 1 ? fmt::format(", first of {} tracks", info.audioTracks) : "";
-}
-
-/// What the headers promise, where that is more than there is; 0 where it cannot be told.
-std::int64_t promisedFrames(const AudioFileInfo& info)
-{
-    if (info.promisedFrames > info.frames)
-        return info.promisedFrames;
-    return info.missingDataSize > 0 && info.bytesPerFrame > 0 ? info.frames + info.missingDataSize / info.bytesPerFrame
-                                                              : 0;
 }
 
 std::string lengthText(const AudioFileInfo& info)
@@ -114,15 +71,54 @@ std::optional<Number> positive(Number number)
     return number > 0 ? std::optional(number) : std::nullopt;
 }
 
+/// What is asked for beside the description itself.
+struct InfoOptions {
+    bool isLong = false, isCheck = false, wantsMD5 = false, wantsSHA256 = false;
+};
+
 /// What is known of a file.
 struct Description {
     AudioFileInfo info;
     FileFacts facts;
+    std::string md5, sha256; // of the sound, in hexadecimal; empty where there is none
 };
+
+std::string hexText(const Bytes& digest)
+{
+    std::string text;
+    for (const std::byte byte : digest)
+        fmt::format_to(std::back_inserter(text), "{:02x}", std::to_integer<unsigned>(byte));
+    return text;
+}
+
+/// Of what is compressed throughout nobody keeps one but FLAC, which states its own.
+void addDigests(Description& description, const std::string& path, const InfoOptions& wanted, bool quiet)
+{
+    using platform::Digest;
+    const AudioFileInfo& info = description.info;
+    const FileAccess access = accessForReading(path, {.quiet = quiet});
+    CFileIO file;
+    requireOK(file.OpenRead(referenceTo(path), 0));
+    if (wanted.wantsMD5)
+        description.md5 = hexText(StatedMD5(file));
+    if (info.dataOffset <= 0 || info.dataSize <= 0)
+        return;
+    Digest md5(Digest::Kind::md5), sha256(Digest::Kind::sha256);
+    std::vector<Digest*> digests;
+    if (wanted.wantsMD5)
+        digests.push_back(&md5);
+    if (wanted.wantsSHA256)
+        digests.push_back(&sha256);
+    requireOK(DigestAudio(file, info, digests));
+    if (wanted.wantsMD5)
+        description.md5 = hexText(md5.finish());
+    if (wanted.wantsSHA256)
+        description.sha256 = hexText(sha256.finish());
+}
 
 void writeJson(JsonWriter& json, const std::string& path, const Description& description)
 {
-    const auto& [info, facts] = description;
+    const auto& [info, facts, md5, sha256] = description;
     json.beginObject();
     json.member("path", path);
     json.member("container", fourCCText(info.containerId));
@@ -147,6 +143,8 @@ void writeJson(JsonWriter& json, const std::string& path, const Description& des
     json.member("isWhole", info.IsWhole());
     json.knownMember("missingBytes", positive(info.missingDataSize));
     json.knownMember("promisedFrames", positive(promisedFrames(info)));
+    json.knownMember("md5", md5);
+    json.knownMember("sha256", sha256);
     json.knownMember("dataOffset", positive(info.dataOffset));
     json.member("fileLength", info.fileLength);
     json.knownMember("typeByName", typeByNameText(facts));
@@ -160,27 +158,31 @@ void writeJson(JsonWriter& json, const std::string& path, const Description& des
     json.endObject();
 }
 
-std::vector<Table::Column> columns(bool isLong)
+std::vector<Table::Column> columns(const InfoOptions& wanted)
 {
     std::vector<Table::Column> titles{{"FILE"},   {"TYPE"},    {"DURATION", Align::right}, {"RATE", Align::right},
                                       {"FORMAT"}, {"CHANNELS"}};
-    if (isLong)
+    if (wanted.isLong)
         titles.insert(titles.end(), {{"BY NAME"}, {"MODIFIED"}, {"STEREO PARTNER"}});
+    if (wanted.wantsMD5)
+        titles.push_back({"MD5"});
+    if (wanted.wantsSHA256)
+        titles.push_back({"SHA-256"});
     return titles;
 }
 
 // Writes the descriptions in one of the forms, each as soon as it is known where the form allows that.
 class InfoWriter {
 public:
-    InfoWriter(const OutputOptions& options, bool isLong)
+    InfoWriter(const OutputOptions& options, const InfoOptions& wanted)
         : form_(outputForm(options)),
           color_(usesColor(options.color)),
-          isLong_(isLong),
+          wanted_(wanted),
           json_(options)
     {
     }
 
-    bool needsFacts() const { return form_ == Form::json || isLong_; }
+    bool needsFacts() const { return form_ == Form::json || wanted_.isLong; }
 
     void add(const std::string& path, const Description& description)
     {
@@ -210,58 +212,80 @@ public:
 private:
     void addRow(const std::string& path, const Description& description)
     {
-        const auto& [info, facts] = description;
+        const auto& [info, facts, md5, sha256] = description;
         std::vector<std::string> row{printable(path),   containerWord(info),
                                      lengthText(info),  rateText(info),
-                                     formatWords(info), channelsText(info) + (isLong_ ? tracksText(info) : "")};
-        if (isLong_) {
+                                     formatWords(info), channelsText(info) + (wanted_.isLong ? tracksText(info) : "")};
+        if (wanted_.isLong) {
             const auto& stereo = facts.stereo;
             row.push_back(typeByNameText(facts));
             row.push_back(localDateText(facts.modified));
             row.push_back(stereo ? printable(stereo->partner) + (stereo->partnerExists ? "" : " (missing)") : "");
         }
+        if (wanted_.wantsMD5)
+            row.push_back(md5);
+        if (wanted_.wantsSHA256)
+            row.push_back(sha256);
         table_.add(std::move(row));
     }
 
     void addLine(const std::string& path, const Description& description)
     {
-        const auto& [info, facts] = description;
+        const auto& [info, facts, md5, sha256] = description;
         output_.print("{}\t{}\t{:.6f}\t{}\t{}\t{}", printable(path), containerWord(info), durationOf(info),
                       info.sampleRate, formatWords(info), info.channels);
-        if (isLong_)
+        if (wanted_.isLong)
             output_.print("\t{}\t{}\t{}\t{}", typeByNameText(facts), dateText(facts.modified),
                           facts.stereo ? printable(facts.stereo->partner) : "",
                           !facts.stereo                 ? ""
                           : facts.stereo->partnerExists ? "there"
                                                         : "missing");
+        if (wanted_.wantsMD5)
+            output_.print("\t{}", md5);
+        if (wanted_.wantsSHA256)
+            output_.print("\t{}", sha256);
         output_.write("\n");
     }
 
     Form form_;
     bool color_;
-    bool isLong_;
+    InfoOptions wanted_;
     Output& output_ = Output::standard();
     JsonRecords json_;
-    Table table_{columns(isLong_)};
+    Table table_{columns(wanted_)};
 };
 
-bool runInfo(const FileArguments& files, bool isLong, const OutputOptions& options)
+bool runInfo(const FileArguments& files, const InfoOptions& wanted, const OutputOptions& options)
 {
-    InfoWriter writer(options, isLong);
+    if (wanted.isCheck)
+        return checkFiles(files, options);
+    InfoWriter writer(options, wanted);
     return writeFileByFile(writer, files, options, [&](const FoundFile& file) {
-        return Description{describe(file.path, options.quiet), writer.needsFacts() ? factsOf(file.path) : FileFacts()};
+        Description description{
+            describeFile(file.path, options.quiet), writer.needsFacts() ? factsOf(file.path) : FileFacts(), {}, {}};
+        if (wanted.wantsMD5 || wanted.wantsSHA256)
+            addDigests(description, file.path, wanted, options.quiet);
+        return description;
     });
 }
 
 void declareInfo(CommandLine& commandLine)
 {
     static FileArguments files;
-    static bool isLong = false;
+    static InfoOptions wanted;
     Verb& verb = commandLine.addVerb("info", "Say what audio files are: length, rate, format, channels",
-                                     [&commandLine] { return runInfo(files, isLong, commandLine.output()); });
+                                     [&commandLine] { return runInfo(files, wanted, commandLine.output()); });
     CommandLine::addFiles(verb, files);
-    verb.addFlag("-l,--long", isLong,
-                 "Also the number of tracks, the type by the name, the date of modification and the stereo partner");
+    const Argument isLong = verb.addFlag(
+        "-l,--long", wanted.isLong,
+        "Also the number of tracks, the type by the name, the date of modification and the stereo partner");
+    const Argument md5 = verb.addFlag("--md5", wanted.wantsMD5, "Also the MD5 of the sound as it is stored");
+    const Argument sha256 = verb.addFlag("--sha256", wanted.wantsSHA256, "Also the SHA-256 of the sound");
+    verb.addFlag("--check", wanted.isCheck,
+                 "Instead what is off, a line each: sizes, order, pads, counts; none: all is well")
+        .excludes(isLong)
+        .excludes(md5)
+        .excludes(sha256);
 }
 
 const VerbRegistration registration{10, declareInfo};

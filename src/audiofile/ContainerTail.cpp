@@ -1,5 +1,6 @@
 #include "audiofile/ContainerTail.h"
 
+#include <algorithm>
 #include <limits>
 
 namespace {
@@ -51,7 +52,7 @@ std::int32_t ExamineContainerTail(CAudioFileIO& file, ContainerTail& tail)
     if (const std::int32_t status = file.ForEachChunk(keep, &tail.extent); status != kStatusOK)
         return status;
     const bool isCAF = tail.extent.id == kCaff;
-    const std::int64_t size = tail.last.size;
+    const std::int64_t size = std::max<std::int64_t>(tail.last.size, 0);
     if (tail.last.offset != 0 && __builtin_add_overflow(tail.last.body + (isCAF ? 0 : size & 1), size, &tail.end))
         tail.end = std::numeric_limits<std::int64_t>::max();
     tail.stray = tail.extent.fileLength - tail.end;

@@ -283,6 +283,7 @@ TEST(ChunkEdit, TheEndIsPreparedWhereThatCostsNothing)
         {"CAF, a header", with(caf(), "123456789012"), with(caf(), "123456789012"), kStatusParameterError},
         {"CAF, unfinished", caf(0), caf(0), kStatusParameterError},
         {"CAF, cut short", caf(100), caf(100), kStatusParameterError},
+        {"CAF, a size far below zero", caf(INT64_MIN + 1000), caf(INT64_MIN + 1000), kStatusParameterError},
     };
     for (const auto& each : cases) {
         SCOPED_TRACE(each.what);

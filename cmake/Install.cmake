@@ -24,7 +24,7 @@ set(media_headers
     media/containers/AudioHandle.h media/containers/ByteSource.h media/containers/ContainerHeaders.h
     media/containers/ContainerCheck.h media/containers/ContainerTraits.h media/containers/HeaderWindow.h
     media/containers/StoredFormat.h
-    media/packets/PacketTable.h
+    media/packets/FileEnds.h media/packets/PacketTable.h
     media/decoding/CompressedAudio.h media/decoding/ConvertingReader.h
     media/userdata/AudioFileService.h)
 foreach(header IN LISTS media_headers)

@@ -42,7 +42,7 @@ class List(CommandTest):
                               ["chunks", "remove", name, "note", "--sidecar", "xyz"]):
                 with self.subTest(arguments):
                     self.assertEqual(loaded(*arguments), (False, 1))
-        self.assertEqual(loaded("info", "a.ogg"), (True, 0))  # or nothing would be seen
+        self.assertEqual(loaded("info", "a.mka"), (True, 0))  # or nothing would be seen
 
     def test_what_is_no_container(self):
         self.write("text.wav", b"no audio file at all")

@@ -77,6 +77,9 @@ Bytes lastBytes(HeaderWindow& file, std::uint32_t largestFrame)
 std::optional<FLACFrame> parseFLACFrame(BytesView bytes, std::uint32_t blockSize)
 {
     constexpr std::size_t kMostHeader = 16, kFixedSize = 4;
+    constexpr std::array<std::uint32_t, 12> rates{0,     88200, 176400, 192000, 8000,  16000,
+                                                  22050, 24000, 32000,  44100,  48000, 96000};
+    constexpr std::array<std::uint32_t, 8> bits{0, 8, 12, 0, 16, 20, 24, 32};
     bytes = bytes.first(std::min(bytes.size(), kMostHeader));
     if (bytes.size() < kFixedSize + 2)
         return {};
@@ -104,11 +107,21 @@ std::optional<FLACFrame> parseFLACFrame(BytesView bytes, std::uint32_t blockSize
                                : code == 6 ? std::to_integer<std::uint32_t>(bytes[at]) + 1
                                : code == 7 ? loadBE<std::uint16_t>(bytes.data() + at) + 1U
                                            : 1U << code;
-    at += sizeBytes + rateBytes;
+    at += sizeBytes;
+    const std::uint32_t written = rateBytes == 1   ? std::to_integer<std::uint32_t>(bytes[at])
+                                  : rateBytes == 2 ? loadBE<std::uint16_t>(bytes.data() + at)
+                                                   : 0U;
+    at += rateBytes;
     if (highFirstCRC<8, 0x07>(bytes.first(at)) != std::to_integer<std::uint32_t>(bytes[at]))
         return {};
     const bool countsSamples = (fixed >> 16 & 1) != 0;
-    return FLACFrame{countsSamples ? number : number * blockSize, size};
+    FLACFrame frame;
+    frame.first = countsSamples ? number : number * blockSize;
+    frame.samples = size;
+    frame.sampleRate = rate < rates.size() ? rates[rate] : written * (rate == 12 ? 1000 : rate == 14 ? 10 : 1);
+    frame.channels = (fixed >> 4 & 8) != 0 ? 2 : (fixed >> 4 & 7) + 1; // two in one of three ways, or as many
+    frame.bits = bits[fixed >> 1 & 7];
+    return frame;
 }
 
 bool flacEndsAt(BytesView tail, std::uint64_t samples, std::uint32_t blockSize)

@@ -33,10 +33,13 @@ FLACProperties readFLACProperties(BytesView bytes);
 /// Which speakers so many channels feed, 1 to 8, when no comment says otherwise.
 std::uint32_t usualSpeakersOfFLAC(std::uint32_t channels);
 
-/// The samples that a frame holds: their number, and that of the first of them.
 struct FLACFrame {
-    std::uint64_t first = 0;
+    std::uint64_t first = 0; // the number of its first sample
     std::uint32_t samples = 0;
+    // Rate and bits are 0 when they are left to the file to say.
+    std::uint32_t sampleRate = 0;
+    std::uint32_t channels = 0;
+    std::uint32_t bits = 0;
 };
 /// By the header that the bytes begin with (RFC 9639, 9.1), whose checksum is compared; none when they begin with none.
 std::optional<FLACFrame> parseFLACFrame(BytesView bytes, std::uint32_t blockSize);

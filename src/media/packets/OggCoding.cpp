@@ -1,6 +1,7 @@
 #include "media/packets/OggCoding.h"
 
 #include "media/packets/FLACInfo.h"
+#include "media/packets/HighFirstCRC.h"
 #include "media/packets/VorbisCoding.h"
 #include "platform/core/Packed.h"
 
@@ -97,12 +98,18 @@ public:
         first_.reset();
         if (packet.empty()) // as some encoders end the stream
             return 0;
+        // A decoder takes no frame whose own checksum is wrong, and what a frame says goes ahead of the header.
         const auto frame = parseFLACFrame(packet, blockSize_);
-        if (!frame)
+        const bool isOfStream = frame && (frame->sampleRate == 0 || frame->sampleRate == format_.sampleRate) &&
+                                frame->channels == format_.channelsPerFrame &&
+                                (frame->bits == 0 || frame->bits == format_.bitsPerChannel) &&
+                                highFirstCRC<16, 0x8005>(packet) == 0;
+        if (!isOfStream)
             return {};
         first_ = frame->first;
         return frame->samples;
     }
+    bool endsInsidePacket() const override { return false; }
     std::optional<std::uint64_t> firstFrame() const override { return first_; }
 
 private:

@@ -35,6 +35,8 @@ public:
     virtual std::optional<std::uint32_t> framesOf(BytesView packet) = 0;
     /// The next packet is not the one behind the last.
     virtual void leap() {}
+    /// Whether the end of the stream may lie inside its last packet.
+    virtual bool endsInsidePacket() const { return true; }
     /// The number of the first frame of the last packet, where it says so.
     virtual std::optional<std::uint64_t> firstFrame() const { return {}; }
 

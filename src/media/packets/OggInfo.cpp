@@ -151,7 +151,8 @@ bool OggEnds::counts(const OggPage& page)
         return page.granule >= 0 && !page.isLast;
     }
     const std::uint64_t all = ahead + frames;
-    return granule_ == all || (page.isLast && granule_ < all && granule_ + lastOnPage > all);
+    return granule_ == all ||
+           (page.isLast && coding_->endsInsidePacket() && granule_ < all && granule_ + lastOnPage > all);
 }
 
 /// Up to the page that counts it.

@@ -1,6 +1,7 @@
 // What the ends of a file prove is what decoding gives, whatever happened to the file; else nothing is told.
 #include "Sounds.h"
 #include "media/decoding/CompressedAudio.h"
+#include "media/packets/HighFirstCRC.h"
 #include "platform/core/Status.h"
 #include "support/FaultInjection.h"
 #include "support/URLs.h"
@@ -173,6 +174,27 @@ TEST(FileEndsOfOgg, areInDoubtWhereThereAreSeveralStreams)
     EXPECT_TRUE(isProven(folder / "a.ogg", fourCC("ogg ")));
     EXPECT_FALSE(isProven(folder / "chained.ogg", fourCC("ogg ")));
     EXPECT_FALSE(isProven(folder / "two.ogg", fourCC("ogg ")));
+}
+
+// FLAC has checksums of its own, and no decoder cuts its last frame.
+TEST(FileEndsOfOgg, areInDoubtWhereAPageIsRightAndItsContentIsNot)
+{
+    const TemporaryFolder folder;
+    writeSound(folder / "IN.wav", 100000, 2, 44100, 16);
+    ASSERT_TRUE(runs(folder, "flac --ogg IN.wav -o a.oga"));
+    const Bytes content = readFile(folder / "a.oga");
+    const std::size_t page = textOf(BytesView(content)).rfind("OggS");
+    const auto isProvenWith = [&](std::size_t at, unsigned bits) {
+        Bytes changed = content;
+        changed[at] ^= static_cast<std::byte>(bits);
+        storeLE<std::uint32_t>(changed.data() + page + 22, 0);
+        storeLE(changed.data() + page + 22, highFirstCRC<32, 0x04C11DB7>(BytesView(changed).subspan(page)));
+        return isProven(folder.write("b.oga", changed), fourCC("ogg "));
+    };
+    EXPECT_TRUE(isProvenWith(content.size() - 1, 0));
+    EXPECT_FALSE(isProvenWith(content.size() - 1, 1));
+    EXPECT_FALSE(isProvenWith(page + 6, 1));    // 100,000 becomes 100,001,
+    EXPECT_FALSE(isProvenWith(page + 6, 0x20)); // or 99,968
 }
 
 TEST(FileEndsOfWavPack, askWhatCorrectsThem)

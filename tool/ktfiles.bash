@@ -51,19 +51,20 @@ _ktfiles()
         fi
     elif [[ $cur == -* ]]; then
         case $verb/$object in
-            info/*) COMPREPLY=($(compgen -W "--long --check --md5 --sha256 $files $common" -- "$cur")) ;;
+            info/*) COMPREPLY=($(compgen -W "--long --check --md5 --sha256 --threads $files $common" -- "$cur")) ;;
             chunks/get) COMPREPLY=($(compgen -W "--output --force --sidecar $common" -- "$cur")) ;;
             chunks/add) COMPREPLY=($(compgen -W "--from --replace --sidecar --force $edit $common" -- "$cur")) ;;
             chunks/remove) COMPREPLY=($(compgen -W "--sidecar --force $edit $common" -- "$cur")) ;;
-            adm/*) COMPREPLY=($(compgen -W "--long --lenient --check $files $common" -- "$cur")) ;;
+            adm/*) COMPREPLY=($(compgen -W "--long --lenient --check --threads $files $common" -- "$cur")) ;;
             tags/set | tags/remove | tags/copy) COMPREPLY=($(compgen -W "$files $edit $common" -- "$cur")) ;;
             overview/*) COMPREPLY=($(compgen -W "--png --svg --width --height --start --end --frames --scale --colors
-                --force --stored --store $files $edit $common" -- "$cur")) ;;
+                --force --stored --store --threads $files $edit $common" -- "$cur")) ;;
             decode/*) COMPREPLY=($(compgen -W "--output --format --rate --channels --bits --start --end --frames --conceal
-                --force $files $common" -- "$cur")) ;;
+                --force --threads $files $common" -- "$cur")) ;;
             lock/*) COMPREPLY=($(compgen -W "--read --write --presenter --timeout -- $common" -- "$cur")) ;;
             scan/*) COMPREPLY=($(compgen -W "--csv --threads $files $common" -- "$cur")) ;;
-            chunks/* | tags/* | pair/*) COMPREPLY=($(compgen -W "$files $common" -- "$cur")) ;;
+            tags/*) COMPREPLY=($(compgen -W "--threads $files $common" -- "$cur")) ;;
+            chunks/* | pair/*) COMPREPLY=($(compgen -W "$files $common" -- "$cur")) ;;
             project/media) COMPREPLY=($(compgen -W "--missing --alternative $common" -- "$cur")) ;;
             project/dirs) COMPREPLY=($(compgen -W "--create --alternative --timeout $common" -- "$cur")) ;;
             project/backup) COMPREPLY=($(compgen -W "--keep --alternative --dry-run --timeout $common" -- "$cur")) ;;

@@ -231,6 +231,10 @@ class Usage(CommandTest):
                 result = self.run_command(*arguments, status=2)
                 self.assertEqual(result.stdout, b"")
                 self.assertNotEqual(result.stderr, b"")
+        for arguments, verbs in ((("chunks", "get", "a.wav", "toolong"), "chunks get"), (("info", "--nothing"), "info")):
+            self.assertTrue(self.run_command(*arguments, status=2).stderr.decode().endswith(f'\nTry "ktfiles help {verbs}".\n'))
+        self.assertTrue(self.run_command("nothing", status=2).stderr.endswith(b'\nTry "ktfiles help".\n'))
+        self.assertEqual(self.run_command("-V").stdout, self.run_command("--version").stdout)
 
 
 class Output(CommandTest):

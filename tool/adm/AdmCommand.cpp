@@ -5,6 +5,7 @@
 #include "tool/adm/AdmTree.h"
 #include "tool/shared/access/FileAccess.h"
 #include "tool/shared/arguments/CommandLine.h"
+#include "tool/shared/arguments/ThreadsOption.h"
 #include "tool/shared/input/FileByFile.h"
 #include "tool/shared/output/Failure.h"
 #include "tool/shared/output/JsonRecords.h"
@@ -23,6 +24,7 @@ struct AdmArguments {
     bool isLenient = false;
     bool isCheck = false;
     bool isLong = false;
+    unsigned threads = 0;
 };
 
 /// A document, and what was said about it.
@@ -44,7 +46,7 @@ ADMDocumentOptions optionsFor(const AdmArguments& arguments)
 enum class Diagnose : bool { no, yes };
 
 /// Throws the Failure of a file that cannot be read, but not for what is wrong with the document.
-ReadDocument readDocument(AdmSource& source, const AdmArguments& arguments, bool quiet, Diagnose diagnose)
+ReadDocument readFrom(AdmSource& source, const AdmArguments& arguments, bool quiet, Diagnose diagnose)
 {
     ReadDocument read;
     read.document = std::make_unique<ADMDocument>(nullptr);
@@ -101,8 +103,19 @@ public:
     bool run()
     {
         bool areFine = true;
+        // What is shown is told while it is read; the findings of a check are held.
+        const FileLoop loop{
+            .threads = arguments_.isCheck ? arguments_.threads : 1, .doing = "checking", .quiet = options_.quiet};
         const bool good = forEachFile(
-            arguments_.files, options_, [&](const FoundFile& file) { areFine = runFile(file) && areFine; },
+            arguments_.files, loop,
+            [&](const FoundFile& file) -> FileRest {
+                if (!arguments_.isCheck)
+                    return [this, &areFine, file] { areFine = show(file) && areFine; };
+                return [this, &areFine, path = file.path, found = check(file)] {
+                    tell(path, found);
+                    areFine = areFine && found.empty();
+                };
+            },
             [&](const std::string& path, const std::string& text) {
                 if (form_ == Form::json)
                     json_.addFailure(path, text);
@@ -113,23 +126,23 @@ public:
     }
 
 private:
-    bool runFile(const FoundFile& file)
+    /// Of an XML file below a folder throws OtherKind: web pages begin with a tag, too.
+    static void requireMeant(const FoundFile& file, const AdmSource& source)
+    {
+        if (file.isBelowFolder() && !source.isAudio())
+            throw OtherKind("is XML, of any kind", OtherKind::Kind::unknown);
+    }
+
+    bool show(const FoundFile& file)
     {
         const std::string& path = file.path;
         const FileAccess access = accessForReading(path, {.quiet = options_.quiet});
-        const bool tells = arguments_.isCheck || arguments_.isLenient;
         AdmSource source(path);
-        if (file.isBelowFolder() && !source.isAudio())
-            throw OtherKind("is XML, of any kind", OtherKind::Kind::unknown); // web pages begin with a tag, too
-        ReadDocument read = readDocument(source, arguments_, options_.quiet, tells ? Diagnose::yes : Diagnose::no);
+        requireMeant(file, source);
+        ReadDocument read = readDocument(source, arguments_.isLenient ? Diagnose::yes : Diagnose::no);
         // To know the place of everything costs a ninth of the time, which only documents with a problem pay.
-        if (!read.isComplete && !tells)
-            read = readDocument(source, arguments_, options_.quiet, Diagnose::yes);
-        if (arguments_.isCheck) {
-            for (ADMDiagnostic& problem : checkFurther(source, *read.document, read.isComplete))
-                read.diagnostics.push_back(std::move(problem));
-            return check(path, read);
-        }
+        if (!read.isComplete && !arguments_.isLenient)
+            read = readDocument(source, Diagnose::yes);
         if (!read.isComplete) {
             const ADMDiagnostic last = read.diagnostics.back();
             read.diagnostics.pop_back();
@@ -140,6 +153,23 @@ private:
         return true;
     }
 
+    /// By any thread.
+    std::vector<ADMDiagnostic> check(const FoundFile& file) const
+    {
+        const FileAccess access = accessForReading(file.path, {.quiet = options_.quiet});
+        AdmSource source(file.path);
+        requireMeant(file, source);
+        ReadDocument read = readDocument(source, Diagnose::yes);
+        for (ADMDiagnostic& problem : checkFurther(source, *read.document, read.isComplete))
+            read.diagnostics.push_back(std::move(problem));
+        return std::move(read.diagnostics);
+    }
+
+    ReadDocument readDocument(AdmSource& source, Diagnose diagnose) const
+    {
+        return readFrom(source, arguments_, options_.quiet || hasSeveral_, diagnose);
+    }
+
     bool fail(const std::string& path, const ADMDiagnostic& problem)
     {
         reportFailure(placeText(path, problem), problemText(problem));
@@ -148,21 +178,20 @@ private:
         return false;
     }
 
-    bool check(const std::string& path, const ReadDocument& read)
+    void tell(const std::string& path, const std::vector<ADMDiagnostic>& found)
     {
         if (form_ == Form::json) {
             JsonWriter& json = json_.begin();
             json.beginObject();
             json.member("path", path);
             json.key("problems");
-            writeDiagnostics(json, read.diagnostics);
+            writeDiagnostics(json, found);
             json.endObject();
             json_.end();
         } else if (form_ != Form::none) {
-            for (const ADMDiagnostic& diagnostic : read.diagnostics)
+            for (const ADMDiagnostic& diagnostic : found)
                 output_.print("{}: {}\n", printable(placeText(path, diagnostic)), printable(problemText(diagnostic)));
         }
-        return read.diagnostics.empty();
     }
 
     void show(const std::string& path, const ReadDocument& read)
@@ -238,6 +267,7 @@ void declareAdm(CommandLine& commandLine)
     Verb& verb = commandLine.addVerb("adm", "Show what the ADM documents of audio files, or in XML files, describe",
                                      [&commandLine] { return AdmCommand(arguments, commandLine.output()).run(); });
     CommandLine::addFiles(verb, arguments.files).describe("Audio files, folders of them, and XML files");
+    addThreads(verb, arguments.threads);
     verb.addFlag("--long", arguments.isLong, "Show every block, with its ID");
     verb.addFlag("--lenient", arguments.isLenient, "Let pass what can be passed over, and list it");
     verb.addFlag("--check", arguments.isCheck, "Print only what is wrong: FILE:LINE:COLUMN: NAME: REASON");

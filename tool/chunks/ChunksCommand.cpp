@@ -126,8 +126,8 @@ bool runList(const FileArguments& files, const OutputOptions& options)
     JsonRecords json(options);
     bool isFirst = true, isWhole = true;
     const bool good = forEachFile(
-        files, options,
-        [&](const FoundFile& file) {
+        files, {.quiet = options.quiet},
+        [&](const FoundFile& file) -> FileRest {
             const bool follows = table && !isFirst;
             ChunkListWriter writer(options, json, file.path, several, follows);
             const std::string error = listFile(file.path, writer, options.quiet);
@@ -137,6 +137,7 @@ bool runList(const FileArguments& files, const OutputOptions& options)
                 output.flush();
                 reportFailure(file.path, error);
             }
+            return [] {};
         },
         [&](const std::string& path, const std::string& text) {
             if (options.wantsJson())

@@ -3,6 +3,8 @@
 #include "tool/decode/DecodeTargets.h"
 #include "tool/shared/arguments/CommandLine.h"
 #include "tool/shared/arguments/SoundRange.h"
+#include "tool/shared/arguments/ThreadsOption.h"
+#include "tool/shared/edits/OutputFile.h"
 #include "tool/shared/input/FileByFile.h"
 #include "tool/shared/input/InputFile.h"
 
@@ -24,6 +26,7 @@ constexpr std::array<NamedDepth, 4> kDepths{
 struct DecodeArguments {
     FileArguments files;
     std::string out;
+    unsigned threads = 0;
     DecodeOptions options;
 };
 
@@ -66,7 +69,14 @@ bool runDecode(DecodeArguments& arguments, OutputOptions output)
         return false;
     DecodeTargets targets(arguments.out, *arguments.options.wishes.format);
     DecodeReport report(toOutput ? Form::none : outputForm(output), output);
-    return writeFileByFile(report, FoundFiles{names.front(), targets.plan(names)}, output, [&](const FoundFile& file) {
+    const FoundFiles found{names.front(), targets.plan(names)};
+    arguments.options.showsProgress = !output.quiet && found.files.size() == 1;
+    prepareOutputFiles();
+    // Each has a temporary file, and the system's signals remove no more.
+    const FileLoop loop{.threads = std::min(threadsFor(arguments.threads), kMostTemporaryFiles),
+                        .doing = "decoding",
+                        .quiet = output.quiet};
+    return writeFileByFile(report, found, loop, [&](const FoundFile& file) {
         requireRegularFile(file.path); // ahead of making a folder for it
         return decodeFile({file.path, targets.outputOf(file)}, arguments.options);
     });
@@ -115,6 +125,7 @@ void declareDecode(CommandLine& commandLine)
     Verb& verb = commandLine.addVerb("decode", "Decode audio files of any format to linear PCM",
                                      [&commandLine] { return runDecode(arguments, commandLine.output()); });
     CommandLine::addFiles(verb, arguments.files);
+    addThreads(verb, arguments.threads);
     CommandLine::addPath(verb, "-o,--output", arguments.out,
                          "The file or folder to write to, \"-\" for standard output; else the current folder")
         .label("OUT");

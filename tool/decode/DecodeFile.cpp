@@ -62,9 +62,9 @@ private:
 
 /// The header, and then the samples; returns the frames that came. The first samples go out with the header: who reads
 /// from a pipe looks at what the first read gives.
-std::int64_t copySound(std::string header, DecodeSource& source, Target& target, bool quiet)
+std::int64_t copySound(std::string header, DecodeSource& source, Target& target, bool showsProgress)
 {
-    Progress progress("decoding", source.sound().frames, quiet);
+    Progress progress("decoding", source.sound().frames, !showsProgress);
     const std::int64_t bytesPerFrame = source.sound().bytesPerFrame();
     std::int64_t done = 0;
     for (std::string_view samples = source.read(); !samples.empty() && !target.failed(); samples = source.read()) {
@@ -89,9 +89,10 @@ void setFrames(const DecodeFrame& frame, std::int64_t frames, const DecodeResult
     target.regular()->rewrite(0, header);
 }
 
-void writeSound(DecodeSource& source, const DecodeFrame& frame, Target& target, bool quiet, DecodeResult& result)
+void writeSound(DecodeSource& source, const DecodeFrame& frame, Target& target, bool showsProgress,
+                DecodeResult& result)
 {
-    const std::int64_t frames = copySound(frame.header(source.sound().frames), source, target, quiet);
+    const std::int64_t frames = copySound(frame.header(source.sound().frames), source, target, showsProgress);
     if (frames != result.sound.frames && !target.failed())
         setFrames(frame, frames, result, target);
     target.write(frame.trailer(frames));
@@ -107,25 +108,19 @@ std::string damageTo(const DecodeSource& source)
     return source.isOtherThanItsChecksum() ? "the sound is not what its checksum says" : "";
 }
 
-void tell(const std::string& path, const std::string& note)
+std::vector<std::string> notesOn(const DecodeSource& source, const DecodeResult& result)
 {
-    reportFailure(path, note);
-}
-
-void tellAll(const std::string& path, const DecodeSource& source, const DecodeResult& result)
-{
-    for (const std::string& note : source.notes())
-        tell(path, note);
+    std::vector<std::string> notes = source.notes();
     if (result.sound.frames < source.sound().frames)
-        tell(path, fmt::format("ends after {} of {} frames", result.sound.frames, source.sound().frames));
+        notes.push_back(fmt::format("ends after {} of {} frames", result.sound.frames, source.sound().frames));
     if (const std::string damage = damageTo(source); !damage.empty())
-        tell(path, damage + (result.missingFrames > 0 ? "; they are silent" : ""));
+        notes.push_back(damage + (result.missingFrames > 0 ? "; they are silent" : ""));
     if (result.clippedSamples > 0)
-        tell(path, fmt::format("{} clipped; --bits f32 keeps what is beyond full scale",
-                               result.clippedSamples == 1 ? "1 sample is"
-                                                          : fmt::format("{} samples are", result.clippedSamples)));
-    for (const std::string& note : result.tags.notKept)
-        tell(path, note);
+        notes.push_back(fmt::format("{} clipped; --bits f32 keeps what is beyond full scale",
+                                    result.clippedSamples == 1 ? "1 sample is"
+                                                               : fmt::format("{} samples are", result.clippedSamples)));
+    notes.insert(notes.end(), result.tags.notKept.begin(), result.tags.notKept.end());
+    return notes;
 }
 
 } // namespace
@@ -143,7 +138,7 @@ DecodeResult decodeFile(const DecodeJob& job, const DecodeOptions& options)
                         .missingFrames = 0,
                         .tags = {}};
     Target target(job, options.force);
-    writeSound(source, frame, target, options.quiet, result);
+    writeSound(source, frame, target, options.showsProgress, result);
     access.reset(); // ahead of the wait for others who have the output
     if (target.failed())
         return result;
@@ -154,7 +149,6 @@ DecodeResult decodeFile(const DecodeJob& job, const DecodeOptions& options)
         tags.carryTo(target.regular() != nullptr ? target.regular()->path() : "", result.container, result.sound,
                      source.sourceRate(), source.isWhole() && result.sound.frames == source.sound().frames);
     target.finish(options.quiet);
-    if (!options.quiet)
-        tellAll(job.file, source, result);
+    result.notes = notesOn(source, result);
     return result;
 }

@@ -5,6 +5,7 @@
 #include "tool/decode/DecodeTags.h"
 
 #include <string>
+#include <vector>
 
 struct DecodeJob {
     std::string file;
@@ -16,6 +17,7 @@ struct DecodeOptions {
     bool force = false;   // replace a file that exists
     bool conceal = false; // take silence where the file is damaged
     bool quiet = false;
+    bool showsProgress = false;
 };
 
 struct DecodeResult {
@@ -25,8 +27,9 @@ struct DecodeResult {
     std::int64_t clippedSamples = 0;
     std::uint64_t missingFrames = 0; // as DecodeSource::missingFrames
     CarriedTags tags;
+    std::vector<std::string> notes = {}; // what is not as people may expect, in words
 };
 
-/// Either the output is written whole, or what had its name is as it was. Tells on standard error, unless `quiet`, what
-/// is not as people may expect. Throws Failure. With standard output gone, ends and leaves it to that to say so.
+/// Either the output is written whole, or what had its name is as it was. Throws Failure. With standard output gone,
+/// ends and leaves it to that to say so.
 DecodeResult decodeFile(const DecodeJob& job, const DecodeOptions& options);

@@ -1,6 +1,7 @@
 #include "tool/decode/DecodeReport.h"
 
 #include "tool/shared/output/ClockTime.h"
+#include "tool/shared/output/Failure.h"
 #include "tool/shared/output/Terminal.h"
 
 #include <cmath>
@@ -52,6 +53,11 @@ void DecodeReport::add(const std::string& path, const DecodeResult& result)
                       result.tags.keys.empty() ? "" : ", with its tags");
     if (form_ == Form::table)
         output_.flush(); // the next file may take its time
+    if (quiet_ || result.notes.empty())
+        return;
+    output_.flush();
+    for (const std::string& note : result.notes)
+        reportFailure(path, note);
 }
 
 void DecodeReport::addFailure(const std::string& path, const std::string& text)

@@ -9,7 +9,7 @@
 /// A writer for writeFileByFile.
 class DecodeReport {
 public:
-    DecodeReport(Form form, const OutputOptions& options) : form_(form), json_(options) {}
+    DecodeReport(Form form, const OutputOptions& options) : form_(form), quiet_(options.quiet), json_(options) {}
 
     void add(const std::string& path, const DecodeResult& result);
     void addFailure(const std::string& path, const std::string& text);
@@ -17,6 +17,7 @@ public:
 
 private:
     Form form_;
+    bool quiet_;
     Output& output_ = Output::standard();
     JsonRecords json_;
 };

@@ -96,8 +96,10 @@ std::string DecodeTargets::outputOf(const FoundFile& file)
     std::string output = nameOf(file);
     if (shared_.contains(file.path))
         throw ToldFailure(fmt::format("is not the only file that would be decoded to {}", output));
-    if (toFolder_)
+    if (toFolder_) {
+        const std::lock_guard guard(mutex_);
         makeFolder(std::filesystem::path(output).parent_path());
+    }
     return output;
 }
 

@@ -5,6 +5,7 @@
 #include "tool/shared/input/FoundFile.h"
 
 #include <filesystem>
+#include <mutex>
 #include <set>
 #include <string>
 #include <vector>
@@ -27,7 +28,7 @@ public:
     /// decoded to one output with another is told on standard error.
     std::vector<FoundFile> plan(const std::vector<std::string>& names);
 
-    /// The output of one of them; its folder is there. Throws Failure.
+    /// The output of one of them; its folder is there. By any thread. Throws Failure.
     std::string outputOf(const FoundFile& file);
 
 private:
@@ -39,5 +40,6 @@ private:
     const DecodeFormat& format_;
     bool toFolder_;
     std::set<std::string> shared_; // files that would be decoded to one output with others
-    std::vector<std::string> made_;
+    std::mutex mutex_;
+    std::vector<std::string> made_; // the mutex's
 };

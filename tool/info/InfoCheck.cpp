@@ -106,10 +106,11 @@ private:
 
 } // namespace
 
-bool checkFiles(const FileArguments& files, const OutputOptions& options)
+bool checkFiles(const FileArguments& files, unsigned threads, const OutputOptions& options)
 {
     CheckWriter writer(options);
-    const bool wereRead = writeFileByFile(writer, files, options,
+    const FileLoop loop{.threads = threads, .doing = "checking", .quiet = options.quiet};
+    const bool wereRead = writeFileByFile(writer, files, loop,
                                           [&](const FoundFile& file) { return problemsOf(file.path, options.quiet); });
     return wereRead && writer.isGood();
 }

@@ -4,5 +4,5 @@
 #include "tool/shared/input/FileArguments.h"
 #include "tool/shared/output/Output.h"
 
-/// False when something is off, and when a file could not be looked at.
-bool checkFiles(const FileArguments& files, const OutputOptions& options);
+/// By `threads` threads, 0 for one per core. False when something is off, and when a file could not be looked at.
+bool checkFiles(const FileArguments& files, unsigned threads, const OutputOptions& options);

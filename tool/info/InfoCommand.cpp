@@ -4,6 +4,7 @@
 #include "tool/info/InfoCheck.h"
 #include "tool/shared/access/FileAccess.h"
 #include "tool/shared/arguments/CommandLine.h"
+#include "tool/shared/arguments/ThreadsOption.h"
 #include "tool/shared/input/CodingWords.h"
 #include "tool/shared/input/FileByFile.h"
 #include "tool/shared/input/FileFacts.h"
@@ -74,6 +75,7 @@ std::optional<Number> positive(Number number)
 /// What is asked for beside the description itself.
 struct InfoOptions {
     bool isLong = false, isCheck = false, wantsMD5 = false, wantsSHA256 = false;
+    unsigned threads = 0;
 };
 
 /// What is known of a file.
@@ -258,9 +260,10 @@ private:
 bool runInfo(const FileArguments& files, const InfoOptions& wanted, const OutputOptions& options)
 {
     if (wanted.isCheck)
-        return checkFiles(files, options);
+        return checkFiles(files, wanted.threads, options);
     InfoWriter writer(options, wanted);
-    return writeFileByFile(writer, files, options, [&](const FoundFile& file) {
+    const FileLoop loop{.threads = wanted.threads, .quiet = options.quiet};
+    return writeFileByFile(writer, files, loop, [&](const FoundFile& file) {
         Description description{
             describeFile(file.path, options.quiet), writer.needsFacts() ? factsOf(file.path) : FileFacts(), {}, {}};
         if (wanted.wantsMD5 || wanted.wantsSHA256)
@@ -276,6 +279,7 @@ void declareInfo(CommandLine& commandLine)
     Verb& verb = commandLine.addVerb("info", "Say what audio files are: length, rate, format, channels",
                                      [&commandLine] { return runInfo(files, wanted, commandLine.output()); });
     CommandLine::addFiles(verb, files);
+    addThreads(verb, wanted.threads);
     const Argument isLong = verb.addFlag(
         "-l,--long", wanted.isLong,
         "Also the number of tracks, the type by the name, the date of modification and the stereo partner");

@@ -29,7 +29,7 @@ void requireSound(const AudioFileInfo& info)
 
 } // namespace
 
-FileOverview FileOverview::computed(const std::string& path, bool quiet)
+FileOverview FileOverview::computed(const std::string& path, bool showsProgress)
 {
     FileOverview overview;
     CAudioFileIO file;
@@ -37,11 +37,10 @@ FileOverview FileOverview::computed(const std::string& path, bool quiet)
     requireDecoder(file);
     overview.info_ = file.Info();
     requireSound(overview.info_);
-    if (overview.info_.missingDataSize > 0 && !quiet)
-        reportFailure(path,
-                      fmt::format("ends ahead of its sound, {} bytes of which are missing; what is there is shown",
-                                  overview.info_.missingDataSize));
-    Progress progress("reading", overview.info_.frames, quiet);
+    if (overview.info_.missingDataSize > 0)
+        overview.note_ = fmt::format("ends ahead of its sound, {} bytes of which are missing; what is there is shown",
+                                     overview.info_.missingDataSize);
+    Progress progress("reading", overview.info_.frames, !showsProgress);
     long long done = 0;
     std::int32_t status = kStatusOK;
     overview.block_ = file.CreateOverview(

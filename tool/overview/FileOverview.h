@@ -11,10 +11,12 @@
 /// Owns the overview block. Throws Failure where a file has no overview.
 class FileOverview {
 public:
-    /// Reads all samples, with a progress bar where that lasts. Says so on standard error, unless `quiet`, when the
-    /// file ends ahead of its sample data; the overview is then of what is there.
-    static FileOverview computed(const std::string& path, bool quiet);
+    /// Reads all samples, with a progress bar where that lasts and it is asked for.
+    static FileOverview computed(const std::string& path, bool showsProgress);
     static FileOverview stored(const std::string& path);
+
+    /// What people should know, when the file ends ahead of its sample data and the overview is of what is there.
+    const std::string& note() const { return note_; }
 
     /// The points, for as long as this lives.
     Waveform waveform() const;
@@ -23,5 +25,6 @@ public:
 
 private:
     AudioFileInfo info_;
+    std::string note_;
     std::unique_ptr<KTMem> block_;
 };

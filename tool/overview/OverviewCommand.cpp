@@ -6,8 +6,10 @@
 #include "tool/shared/access/FileAccess.h"
 #include "tool/shared/arguments/CommandLine.h"
 #include "tool/shared/arguments/SoundRange.h"
+#include "tool/shared/arguments/ThreadsOption.h"
 #include "tool/shared/edits/OutputFile.h"
 #include "tool/shared/input/FileByFile.h"
+#include "tool/shared/input/FileVersion.h"
 #include "tool/shared/output/ClockTime.h"
 #include "tool/shared/output/Failure.h"
 
@@ -29,6 +31,7 @@ struct OverviewArguments {
     OutputFile::Existing existing = OutputFile::Existing::refuse;
     bool fromStored = false;
     bool store = false;
+    unsigned threads = 0;
     EditOptions edit;
 
     bool draws() const { return !png.empty() || !svg.empty(); }
@@ -77,7 +80,33 @@ void requireFreeNames(const std::string& path, const OverviewArguments& argument
             requireFreeName(out, arguments.existing);
 }
 
-void workOn(const std::string& path, const OverviewArguments& arguments, OverviewReport& report)
+// An overview, and the file as it was before it was read.
+struct Reading {
+    FileOverview overview;
+    FileVersion version;
+};
+
+Reading readOverview(const std::string& path, const OverviewArguments& arguments)
+{
+    requireFreeNames(path, arguments);
+    const FileAccess access = accessForReading(path, arguments.edit.waiting());
+    const FileVersion version = versionOf(path);
+    if (arguments.store)
+        requireRoomForOverview(path);
+    const bool showsProgress = !arguments.edit.quiet && !arguments.files.maybeSeveral();
+    return {arguments.fromStored ? FileOverview::stored(path) : FileOverview::computed(path, showsProgress), version};
+}
+
+// Files are edited one by one. What was changed meanwhile, if only by the edit of another of its names, is read again.
+StoreResult store(const std::string& path, Reading& reading, const OverviewArguments& arguments)
+{
+    SafeEdit edit(path, arguments.edit);
+    if (versionOf(path) != reading.version)
+        reading.overview = FileOverview::computed(edit.target(), false);
+    return storeOverview(edit, reading.overview, arguments.edit);
+}
+
+void tellOf(const std::string& path, Reading& reading, const OverviewArguments& arguments, OverviewReport& report)
 {
     OverviewDeeds deeds{.png = arguments.png,
                         .svg = arguments.svg,
@@ -85,22 +114,15 @@ void workOn(const std::string& path, const OverviewArguments& arguments, Overvie
                         .height = arguments.picture.height,
                         .store = {},
                         .dryRun = arguments.edit.dryRun};
-    requireFreeNames(path, arguments);
-    std::optional<SafeEdit> edit; // ahead of the reading, so that it notices changes made meanwhile
-    FileAccess access;
-    if (arguments.store) {
-        edit.emplace(path, arguments.edit);
-        requireRoomForOverview(path);
-    } else {
-        access = accessForReading(path, {.quiet = arguments.edit.quiet});
+    if (!reading.overview.note().empty() && !arguments.edit.quiet) {
+        Output::standard().flush();
+        reportFailure(path, reading.overview.note());
     }
-    FileOverview overview =
-        arguments.fromStored ? FileOverview::stored(path) : FileOverview::computed(path, arguments.edit.quiet);
     if (arguments.draws())
-        drawPictures(path, overview.waveform(), arguments);
-    if (edit)
-        deeds.store = storeOverview(*edit, overview, arguments.edit);
-    report.add(path, overview, deeds);
+        drawPictures(path, reading.overview.waveform(), arguments);
+    if (arguments.store)
+        deeds.store = store(path, reading, arguments);
+    report.add(path, reading.overview, deeds);
 }
 
 // What the parser cannot see: options that make sense only together, or not together.
@@ -139,7 +161,11 @@ bool runOverview(OverviewArguments& arguments, const Verb& verb, OutputOptions o
         output.quiet = true;
     OverviewReport report(output, arguments.files);
     const bool good = forEachFile(
-        arguments.files, output, [&](const FoundFile& file) { workOn(file.path, arguments, report); },
+        arguments.files, {.threads = arguments.threads, .quiet = output.quiet},
+        [&](const FoundFile& file) -> FileRest {
+            const auto reading = std::make_shared<Reading>(readOverview(file.path, arguments));
+            return [&, path = file.path, reading] { tellOf(path, *reading, arguments, report); };
+        },
         [&](const std::string& path, const std::string& text) { report.addFailure(path, text); });
     report.finish();
     return good;
@@ -182,6 +208,7 @@ void declareOverview(CommandLine& commandLine)
     verb = &commandLine.addVerb("overview", "Show waveforms: in the terminal, as numbers, as a PNG or SVG; store them",
                                 [&commandLine] { return runOverview(arguments, *verb, commandLine.output()); });
     CommandLine::addFiles(*verb, arguments.files);
+    addThreads(*verb, arguments.threads);
     addPictureOptions(*verb, arguments);
     verb->addFlag("--stored", arguments.fromStored, "Take the overview that is stored in the file, not the sound");
     verb->addFlag("--store", arguments.store, "Store the overview in the file");

@@ -67,17 +67,19 @@ bool runPair(const FileArguments& files, const OutputOptions& options)
 {
     PairWriter writer(options);
     std::set<std::string> seen; // halves that were listed
-    const auto add = [&](const FoundFile& file) {
+    const auto add = [&](const FoundFile& file) -> FileRest {
         const std::optional<StereoHalf> half = stereoHalf(file.path);
         if (!half || !seen.insert(file.path).second)
-            return;
+            return [] {};
         seen.insert(half->partner);
         const bool isLeft = half->isLeft, hasPartner = half->partnerExists;
         writer.add({isLeft ? file.path : half->partner, isLeft ? half->partner : file.path, isLeft || hasPartner,
                     !isLeft || hasPartner});
+        return [] {};
     };
-    const bool good = forEachFile(
-        files, options, add, [&](const std::string& path, const std::string& text) { writer.addFailure(path, text); });
+    const bool good =
+        forEachFile(files, {.quiet = options.quiet}, add,
+                    [&](const std::string& path, const std::string& text) { writer.addFailure(path, text); });
     writer.finish();
     return good;
 }

@@ -1,11 +1,12 @@
 // ktfiles scan: every loop below folders, one record each.
-#include "tool/scan/OrderedWork.h"
-#include "tool/scan/ScanProgress.h"
 #include "tool/scan/ScanRecord.h"
 #include "tool/shared/arguments/CommandLine.h"
+#include "tool/shared/arguments/ThreadsOption.h"
 #include "tool/shared/input/FolderWalk.h"
 #include "tool/shared/looptags/LoopTags.h"
 #include "tool/shared/output/Failure.h"
+#include "tool/shared/output/FilesProgress.h"
+#include "tool/shared/threads/OrderedWork.h"
 
 #include <algorithm>
 #include <unistd.h>
@@ -15,7 +16,6 @@ namespace {
 // Files travel in batches, which cost the threads less than one by one.
 constexpr std::size_t kBatch = 64;
 constexpr unsigned kBatchesPerThread = 8;
-constexpr unsigned kMostThreads = 256;
 
 using Batch = std::vector<FoundFile>;
 using Records = std::vector<ScanRecord>;
@@ -45,7 +45,7 @@ void walkBatches(const std::vector<std::string>& folders, const std::function<bo
 }
 
 // Counts ahead of the scan, which costs it little: no file is opened.
-void countInto(ScanProgress& progress, const std::vector<std::string>& folders, const std::stop_token& stop)
+void countInto(FilesProgress& progress, const std::vector<std::string>& folders, const std::stop_token& stop)
 {
     std::int64_t files = 0;
     FolderWalk walk(folders, [&](const FoundFile&) {
@@ -56,16 +56,10 @@ void countInto(ScanProgress& progress, const std::vector<std::string>& folders, 
         progress.setTotal(files);
 }
 
-unsigned threadsFor(const ScanArguments& arguments)
-{
-    const unsigned threads = arguments.threads != 0 ? arguments.threads : std::thread::hardware_concurrency();
-    return std::clamp(threads, 1U, kMostThreads);
-}
-
 // Puts results out in their order, and keeps the bad files, to be listed at the end.
 class ResultWriter {
 public:
-    ResultWriter(ScanWriter& writer, ScanProgress& progress) : writer_(writer), progress_(progress) {}
+    ResultWriter(ScanWriter& writer, FilesProgress& progress) : writer_(writer), progress_(progress) {}
 
     /// False when no more is wanted.
     bool add(Records records)
@@ -93,7 +87,7 @@ public:
 
 private:
     ScanWriter& writer_;
-    ScanProgress& progress_;
+    FilesProgress& progress_;
     std::vector<BadFile> bad_;
 };
 
@@ -129,14 +123,14 @@ bool runScan(const ScanArguments& arguments, const OutputOptions& options)
         return false;
     const ScanForm form = arguments.csv ? ScanForm::csv : scanForm(outputForm(options));
     ScanWriter writer(form, options);
-    ScanProgress progress(options.quiet);
+    FilesProgress progress("scanning", options.quiet);
     ResultWriter results(writer, progress);
     {
         std::jthread counter;
         if (progress.isActive())
             counter = startedThread([&](const std::stop_token& stop) { countInto(progress, folders, stop); });
         scanByThreads(
-            folders, threadsFor(arguments),
+            folders, threadsFor(arguments.threads),
             [form](const Batch& batch) {
                 Records records;
                 for (const FoundFile& file : batch)
@@ -160,8 +154,7 @@ void declareScan(CommandLine& commandLine)
                                      [&commandLine] { return runScan(arguments, commandLine.output()); });
     CommandLine::addFiles(verb, arguments.folders, "FOLDER").describe("The folders");
     verb.addFlag("--csv", arguments.csv, "Print comma-separated values (RFC 4180), with a header");
-    verb.addNumber("-j,--threads", arguments.threads, {1, kMostThreads},
-                   "How many files are read at once; else one per core");
+    addThreads(verb, arguments.threads);
 }
 
 const VerbRegistration registration{40, declareScan};

@@ -2,6 +2,7 @@
 
 #include "tool/shared/access/FileAccess.h"
 #include "tool/shared/arguments/CommandLine.h"
+#include "tool/shared/arguments/ThreadsOption.h"
 #include "tool/shared/input/FileByFile.h"
 #include "tool/shared/looptags/LoopTags.h"
 #include "tool/shared/output/Failure.h"
@@ -70,10 +71,11 @@ private:
     JsonRecords json_;
 };
 
-bool runTags(const FileArguments& files, const OutputOptions& options)
+bool runTags(const FileArguments& files, unsigned threads, const OutputOptions& options)
 {
     TagsWriter writer(options, files.maybeSeveral());
-    return writeFileByFile(writer, files, options, [&](const FoundFile& file) {
+    const FileLoop loop{.threads = threads, .quiet = options.quiet};
+    return writeFileByFile(writer, files, loop, [&](const FoundFile& file) {
         const FileAccess access = accessForReading(file.path, {.quiet = options.quiet});
         return readLoopTags(file.path);
     });
@@ -82,9 +84,11 @@ bool runTags(const FileArguments& files, const OutputOptions& options)
 void declareTags(CommandLine& commandLine)
 {
     static FileArguments files;
+    static unsigned threads = 0;
     Verb& verb = commandLine.addVerb("tags", "Show the loop tags of AIFF and CAF files; set, remove or copy some",
-                                     [&commandLine] { return runTags(files, commandLine.output()); });
+                                     [&commandLine] { return runTags(files, threads, commandLine.output()); });
     CommandLine::addFiles(verb, files);
+    addThreads(verb, threads);
     declareTagsSet(commandLine, verb);
     declareTagsRemove(commandLine, verb);
     declareTagsCopy(commandLine, verb);

@@ -42,7 +42,7 @@ platform::URLRef coordinatedURL(const std::string& path)
     const auto text = platform::String::fromFileSystemRepresentation(absolute.c_str());
     auto url = platform::URL::createWithFileSystemPath(text, platform::PathStyle::posix, false);
     if (!url)
-        throw Failure("its path is not valid UTF-8");
+        throw OtherKind("its path is not valid UTF-8", OtherKind::Kind::unknown);
     return url;
 }
 

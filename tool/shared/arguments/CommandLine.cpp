@@ -74,6 +74,20 @@ std::string usageMessage(const UsageError& error)
     return message;
 }
 
+// The verb that the arguments begin with and its object, each with a space ahead.
+std::string verbsIn(const std::vector<std::string>& arguments, const Verb& program)
+{
+    std::string words;
+    const Verb* verb = &program;
+    for (const std::string& argument : arguments) {
+        verb = verb->find(argument);
+        if (verb == nullptr)
+            break;
+        words += " " + argument;
+    }
+    return words;
+}
+
 } // namespace
 
 CommandLine::CommandLine()
@@ -198,7 +212,10 @@ int CommandLine::parseAndRun(const std::vector<std::string>& arguments)
         Output::standard().write(text);
         return verb == nullptr || verb->work() ? kExitOK : failureStatus_;
     } catch (const UsageError& error) {
-        std::fputs(fmt::format("ktfiles: {}\nTry \"ktfiles help\".\n", usageMessage(error)).c_str(), stderr);
+        std::fputs(
+            fmt::format("ktfiles: {}\nTry \"ktfiles help{}\".\n", usageMessage(error), verbsIn(arguments, program_))
+                .c_str(),
+            stderr);
         return kExitUsage;
     }
 }

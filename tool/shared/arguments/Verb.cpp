@@ -102,7 +102,7 @@ Argument& Argument::excludes(const Argument& other)
 Verb::Verb(const std::string& name, const std::string& description, const std::string& version)
     : app_(std::make_shared<CLI::App>(description, name))
 {
-    app_->set_version_flag("--version", name + " " + version, "Print the version");
+    app_->set_version_flag("-V,--version", name + " " + version, "Print the version");
     app_->set_help_flag("-h,--help", "Print this help");
     app_->require_subcommand(0, 1);
     app_->formatter(std::make_shared<HelpFormatter>());

@@ -24,6 +24,17 @@ namespace {
     throw Failure(out + " exists; --force replaces it");
 }
 
+// Can only be asked for by being changed, which other threads must not see.
+mode_t creationMask()
+{
+    static const mode_t mask = [] {
+        const mode_t found = ::umask(0);
+        ::umask(found);
+        return found;
+    }();
+    return mask;
+}
+
 void requireFolderOf(const std::string& out)
 {
     const std::string folder = std::filesystem::path(out).parent_path().string();
@@ -59,11 +70,10 @@ OutputFile::OutputFile(const std::string& out, const std::string& source, Existi
         target_ = replaced_ = std::filesystem::canonical(out).string();
     if (exists && ::access(target_.c_str(), W_OK) != 0)
         throw Failure(out + ": " + systemErrorText(errno));
-    const mode_t mask = ::umask(0);
-    ::umask(mask);
-    mode_ = 0666 & ~mask;
+    mode_ = 0666 & ~creationMask();
     removeTemporaryFilesAtEndingSignals();
     file_ = std::make_unique<CTemporaryFile>();
+    const BeforeTheEnd notTooLate;
     requireNone(file_->Create(target_));
 }
 
@@ -147,6 +157,12 @@ void OutputFile::writeInto(const platform::OwnedDescriptor& replaced)
         failToWrite(errno);
     requireNone(CopyFileContent(file_->Descriptor(), replaced.get()));
     synchronize(replaced.get());
+}
+
+void prepareOutputFiles()
+{
+    creationMask();
+    removeTemporaryFilesAtEndingSignals();
 }
 
 void requireFreeName(const std::string& out, OutputFile::Existing existing)

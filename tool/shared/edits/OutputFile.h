@@ -51,6 +51,11 @@ private:
     platform::OwnedDescriptor device_;
 };
 
+/// How many may be written at once.
+inline constexpr unsigned kMostTemporaryFiles = 16;
+/// Ahead of threads that write OutputFiles.
+void prepareOutputFiles();
+
 /// Throws the Failure of a file that an OutputFile would not replace: ahead of long work.
 void requireFreeName(const std::string& out, OutputFile::Existing existing);
 

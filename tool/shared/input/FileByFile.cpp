@@ -1,84 +1,172 @@
 #include "tool/shared/input/FileByFile.h"
 
+#include "tool/shared/arguments/ThreadsOption.h"
 #include "tool/shared/input/FolderWalk.h"
+#include "tool/shared/output/FilesProgress.h"
+#include "tool/shared/threads/OrderedWork.h"
 
 #include <algorithm>
+#include <exception>
+#include <unistd.h>
 
 namespace {
 
-/// One walk over files.
-class FileLoop {
-public:
-    FileLoop(const FileWork& work, const FileFailure& fail) : work_(work), fail_(fail) {}
+constexpr std::size_t kFilesPerThread = 64; // that wait, or whose results do
 
-    /// False when no more is wanted.
-    bool visit(const FoundFile& file)
+/// False when no more is wanted.
+using Visit = std::function<bool(FoundFile file)>;
+/// Visits all files; may be called twice.
+using Walk = std::function<void(const Visit& visit)>;
+
+/// What the first half of the work came to.
+struct Answer {
+    FoundFile file;
+    FileRest rest;
+    std::exception_ptr problem;
+};
+
+class FileWork {
+public:
+    FileWork(const FileLoop& loop, const FileStart& start, const FileFailure& fail)
+        : loop_(loop),
+          start_(start),
+          fail_(fail),
+          progress_(loop.doing, loop.quiet)
     {
-        try {
-            if (!file.problem.empty())
-                throw Failure(file.problem);
-            work_(file);
-            hasAny_ = true;
-        } catch (const ToldFailure& failure) {
-            take(file.path, failure.what());
-        } catch (const Failure& failure) {
-            if (!isPassedOver(file, failure))
-                fail(file.path, failure.what());
-        }
-        return !Output::standard().failed();
+    }
+
+    void run(const Walk& walk, bool maybeSeveral)
+    {
+        std::jthread counter;
+        if (maybeSeveral && progress_.isActive())
+            counter = startedThread([this, &walk](const std::stop_token& stop) { count(walk, stop); });
+        const unsigned threads = maybeSeveral ? threadsFor(loop_.threads) : 1;
+        if (threads == 1 || !runByThreads(walk, threads))
+            walk([this](FoundFile file) { return take(answerFor(file)); });
+        progress_.hide();
     }
     void fail(const std::string& path, const std::string& text)
     {
-        take(path, text);
+        note(path, text);
+        progress_.hide();
+        Output::standard().flush(); // what was told so far comes first
         reportFailure(path, text);
     }
     /// Nothing was there: neither a file to work on nor one that failed.
-    void tellIfNone(const std::string& folder, bool quiet) const
+    void tellIfNone(const std::string& folder) const
     {
-        if (!hasAny_ && !quiet && !Output::standard().failed())
+        if (!hasAny_ && !loop_.quiet && !Output::standard().failed())
             reportFailure(folder, "no file for this verb is there");
     }
     bool isGood() const { return isGood_; }
 
 private:
-    void take(const std::string& path, const std::string& text)
+    /// False when there is no thread for it.
+    bool runByThreads(const Walk& walk, unsigned threads)
+    {
+        OrderedWork<FoundFile, Answer> work(threads, std::size_t{threads} * kFilesPerThread,
+                                            [this](const FoundFile& file) { return answerFor(file); });
+        const std::jthread walker = startedThread([&] {
+            walk([&](FoundFile file) { return work.give(std::move(file)); });
+            work.close();
+        });
+        if (!walker.joinable())
+            return false;
+        while (auto answer = work.take())
+            if (!take(std::move(*answer)))
+                break;
+        work.stop();
+        return true;
+    }
+    void count(const Walk& walk, const std::stop_token& stop)
+    {
+        std::int64_t files = 0;
+        walk([&](const FoundFile&) {
+            ++files;
+            return !stop.stop_requested();
+        });
+        if (!stop.stop_requested())
+            progress_.setTotal(files);
+    }
+    Answer answerFor(const FoundFile& file) const
+    {
+        Answer answer{file, {}, {}};
+        try {
+            if (!file.problem.empty())
+                throw Failure(file.problem);
+            answer.rest = start_(file);
+        } catch (...) {
+            answer.problem = std::current_exception();
+        }
+        return answer;
+    }
+    bool take(Answer answer)
+    {
+        const std::string& path = answer.file.path;
+        if (sharesTerminal_)
+            progress_.hide();
+        try {
+            if (answer.problem)
+                std::rethrow_exception(answer.problem);
+            answer.rest();
+            hasAny_ = true;
+        } catch (const ToldFailure& failure) {
+            note(path, failure.what());
+        } catch (const Failure& failure) {
+            if (!isPassedOver(answer.file, failure))
+                fail(path, failure.what());
+        }
+        if (sharesTerminal_)
+            Output::standard().flush(); // ahead of the next line of progress
+        progress_.advance(1);
+        return !Output::standard().failed();
+    }
+    void note(const std::string& path, const std::string& text)
     {
         isGood_ = false;
         hasAny_ = true;
         fail_(path, text);
     }
 
-    const FileWork& work_;
+    const FileLoop& loop_;
+    const FileStart& start_;
     const FileFailure& fail_;
+    FilesProgress progress_;
+    bool sharesTerminal_ = progress_.isActive() && isTerminal(STDOUT_FILENO);
     bool hasAny_ = false;
     bool isGood_ = true;
 };
 
 } // namespace
 
-bool forEachFile(const FileArguments& files, const OutputOptions& options, const FileWork& work,
-                 const FileFailure& fail)
+bool forEachFile(const FileArguments& files, const FileLoop& loop, const FileStart& start, const FileFailure& fail)
 {
-    FileLoop loop(work, fail);
+    FileWork work(loop, start, fail);
     std::vector<std::string> names;
     try {
         names = allNames(files);
     } catch (const Failure& failure) {
-        loop.fail(files.listName(), failure.what());
+        work.fail(files.listName(), failure.what());
         return false;
     }
-    if (files.takesFolders)
-        FolderWalk(names, [&](const FoundFile& file) { return loop.visit(file); }).run();
-    else
-        std::ranges::all_of(names, [&](const std::string& name) { return loop.visit({name, {}}); });
-    loop.tellIfNone(names.front(), options.quiet);
-    return loop.isGood();
+    const auto walk = [&](const Visit& visit) {
+        if (files.takesFolders)
+            FolderWalk(names, visit).run();
+        else
+            std::ranges::all_of(names, [&](const std::string& name) { return visit({name, {}}); });
+    };
+    work.run(walk, files.maybeSeveral());
+    work.tellIfNone(names.front());
+    return work.isGood();
 }
 
-bool forEachFile(const FoundFiles& found, const OutputOptions& options, const FileWork& work, const FileFailure& fail)
+bool forEachFile(const FoundFiles& found, const FileLoop& loop, const FileStart& start, const FileFailure& fail)
 {
-    FileLoop loop(work, fail);
-    std::ranges::all_of(found.files, [&](const FoundFile& file) { return loop.visit(file); });
-    loop.tellIfNone(found.name, options.quiet);
-    return loop.isGood();
+    FileWork work(loop, start, fail);
+    const auto walk = [&](const Visit& visit) {
+        std::ranges::all_of(found.files, [&](const FoundFile& file) { return visit(file); });
+    };
+    work.run(walk, found.files.size() > 1);
+    work.tellIfNone(found.name);
+    return work.isGood();
 }

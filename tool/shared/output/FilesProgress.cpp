@@ -1,4 +1,4 @@
-#include "tool/scan/ScanProgress.h"
+#include "tool/shared/output/FilesProgress.h"
 
 #include "tool/shared/output/Terminal.h"
 
@@ -9,11 +9,13 @@
 #include <unistd.h>
 #include <utility>
 
-ScanProgress::ScanProgress(bool quiet) : active_(!quiet && isTerminal(STDERR_FILENO))
+FilesProgress::FilesProgress(std::string label, bool quiet)
+    : label_(std::move(label)),
+      active_(!quiet && isTerminal(STDERR_FILENO))
 {
 }
 
-void ScanProgress::advance(std::int64_t files)
+void FilesProgress::advance(std::int64_t files)
 {
     done_ += files;
     const Clock::time_point now = Clock::now();
@@ -23,16 +25,16 @@ void ScanProgress::advance(std::int64_t files)
     draw(now);
 }
 
-void ScanProgress::hide()
+void FilesProgress::hide()
 {
     if (std::exchange(shown_, false)) {
         std::fputs("\r\x1b[K", stderr);
         std::fflush(stderr);
-        nextDraw_ = Clock::now();
+        nextDraw_ = Clock::now() + std::chrono::milliseconds(100);
     }
 }
 
-void ScanProgress::draw(Clock::time_point now)
+void FilesProgress::draw(Clock::time_point now)
 {
     const double seconds = std::chrono::duration<double>(now - start_).count();
     const double rate = static_cast<double>(done_) / seconds;
@@ -42,12 +44,12 @@ void ScanProgress::draw(Clock::time_point now)
     if (total >= done_ && done_ > 0) {
         const auto left = static_cast<std::int64_t>(static_cast<double>(total - done_) / rate + 0.5);
         text = fmt::format("{} of {} files, {:.0f}/s, {}:{:02} left", done_, total, rate, left / 60, left % 60);
-        const int width = std::clamp(terminalColumns() - displayWidth(text) - 12, 0, 30);
+        const int width = std::clamp(terminalColumns() - displayWidth(text) - displayWidth(label_) - 4, 0, 30);
         const int full =
             static_cast<int>(static_cast<double>(width) * static_cast<double>(done_) / static_cast<double>(total));
         bar = fmt::format("{:█<{}}{:░<{}} ", "", full, "", width - full);
     }
-    std::fputs(fmt::format("\rscanning {}{}\x1b[K", bar, text).c_str(), stderr);
+    std::fputs(fmt::format("\r{} {}{}\x1b[K", label_, bar, text).c_str(), stderr);
     std::fflush(stderr);
     shown_ = true;
 }

@@ -1,17 +1,20 @@
-// The progress of a scan on standard error: files done, their rate, and once their number is known the time left.
+// The progress of work on many files, on standard error: files done, their rate, and once their number is known the
+// time left.
 #pragma once
 
 #include <atomic>
 #include <chrono>
 #include <cstdint>
+#include <string>
 
 /// Shows itself after a second, on a terminal only, and is gone when it is destroyed.
-class ScanProgress {
+class FilesProgress {
 public:
-    explicit ScanProgress(bool quiet);
-    ScanProgress(const ScanProgress&) = delete;
-    ScanProgress& operator=(const ScanProgress&) = delete;
-    ~ScanProgress() { hide(); }
+    /// `label` says what is done: "scanning".
+    FilesProgress(std::string label, bool quiet);
+    FilesProgress(const FilesProgress&) = delete;
+    FilesProgress& operator=(const FilesProgress&) = delete;
+    ~FilesProgress() { hide(); }
 
     /// Whether it will ever show, and so whether counting the files ahead is of use.
     bool isActive() const { return active_; }
@@ -25,6 +28,7 @@ private:
     using Clock = std::chrono::steady_clock;
     void draw(Clock::time_point now);
 
+    std::string label_;
     bool active_;
     bool shown_ = false;
     std::atomic<std::int64_t> total_ = 0; // 0: not known yet

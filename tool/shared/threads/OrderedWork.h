@@ -2,8 +2,10 @@
 // waiting results pile up: whoever is ahead waits.
 #pragma once
 
-#include "tool/scan/StartedThread.h"
+#include "tool/shared/threads/StartedThread.h"
 
+#include <algorithm>
+#include <array>
 #include <condition_variable>
 #include <deque>
 #include <functional>
@@ -18,7 +20,8 @@ template <class Job, class Result>
 class OrderedWork {
 public:
     OrderedWork(unsigned threads, std::size_t window, std::function<Result(const Job&)> work)
-        : window_(window),
+        : threadCount_(threads),
+          window_(window),
           work_(std::move(work))
     {
         threads_.reserve(threads);
@@ -94,20 +97,30 @@ private:
             ready_.wait(lock, [this] { return stopped_ || closed_ || started_ < entries_.size(); });
             if (stopped_ || started_ == entries_.size())
                 return;
-            Entry& entry = entries_[started_++]; // stays where it is while others come and go at the ends
-            lock.unlock();
-            Result result = work_(entry.job);
-            lock.lock();
-            entry.result = std::move(result);
-            if (&entry == &entries_.front())
-                done_.notify_one();
+            // Of many jobs several, for which one waits once; of few one, so that all threads have some.
+            const std::size_t share = (entries_.size() - started_) / (2 * threadCount_);
+            std::array<Entry*, kMostAtOnce> taken; // they stay where they are while others come and go at the ends
+            const std::size_t count = std::clamp<std::size_t>(share, 1, kMostAtOnce);
+            for (std::size_t i = 0; i < count; ++i)
+                taken[i] = &entries_[started_++];
+            for (std::size_t i = 0; i < count && !stopped_; ++i) {
+                lock.unlock();
+                Result result = work_(taken[i]->job);
+                lock.lock();
+                taken[i]->result = std::move(result);
+                if (taken[i] == &entries_.front())
+                    done_.notify_one();
+            }
         }
     }
+
+    static constexpr std::size_t kMostAtOnce = 8;
 
     std::mutex mutex_;
     std::condition_variable room_, ready_, done_;
     std::deque<Entry> entries_; // in order; the first `started_` are done or being worked on
     std::size_t started_ = 0;
+    std::size_t threadCount_;
     std::size_t window_;
     bool closed_ = false;
     bool stopped_ = false;

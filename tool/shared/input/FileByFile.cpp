@@ -72,10 +72,13 @@ private:
         });
         if (!walker.joinable())
             return false;
+        struct Stopping { // ahead of waiting for the walker, also when there is no memory left
+            decltype(work)& stopped;
+            ~Stopping() { stopped.stop(); }
+        } const stopping{work};
         while (auto answer = work.take())
             if (!take(std::move(*answer)))
                 break;
-        work.stop();
         return true;
     }
     void count(const Walk& walk, const std::stop_token& stop)

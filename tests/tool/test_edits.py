@@ -147,6 +147,8 @@ class Edits(CommandTest):
         self.assertIn("a.wav.bak is the same file still", self.failure("chunks", "add", "a.wav", "note", "--in-place"))
         self.assertEqual(path.read_bytes(), wave())
         self.assertTrue(self.record("chunks", "add", "a.wav", "note", "--backup")["backup"].endswith("a.wav.bak"))
+        for name, why in (("none", "none: file not found"), (".", ". is a folder")):
+            self.assertEqual(self.failure("chunks", "add", "a.wav", "note", "--from", name), f"ktfiles: a.wav: {why}\n")
         self.assertEqual((self.folder / "a.wav.bak").read_bytes(), wave())
         self.assertEqual(path.read_bytes(), wave(chunk(b"note", b"")))
         self.assert_no_litter("a.wav", "a.wav.bak")

@@ -34,6 +34,8 @@ Bytes readAll(const std::string& from)
     const platform::OwnedDescriptor opened(standardInput ? -1 : ::open(from.c_str(), O_RDONLY | O_NOCTTY | O_CLOEXEC));
     const int descriptor = standardInput ? STDIN_FILENO : opened.get();
     const std::string name = standardInput ? "standard input" : from;
+    if (!standardInput && !opened)
+        throw Failure(name + ": " + systemErrorText(errno));
     constexpr std::size_t kStep = 1 << 20;
     Bytes bytes;
     std::size_t length = 0;
@@ -42,7 +44,7 @@ Bytes readAll(const std::string& from)
             bytes.resize(std::max(bytes.size() * 2, kStep));
         const ssize_t got = ::read(descriptor, bytes.data() + length, bytes.size() - length);
         if (got < 0 && errno != EINTR)
-            throw Failure(name + ": " + systemErrorText(errno));
+            throw Failure(name + (errno == EISDIR ? " is a folder" : ": " + systemErrorText(errno)));
         if (got == 0)
             break;
         length += static_cast<std::size_t>(std::max<ssize_t>(got, 0));

@@ -38,7 +38,7 @@ _ktfiles()
     esac
 
     if ((cword == 1)); then
-        COMPREPLY=($(compgen -W 'info pair chunks tags scan overview adm project lock locks decode help --help --version' -- "$cur"))
+        COMPREPLY=($(compgen -W 'info pair chunks tags scan overview adm project lock locks decode help --help --version -V' -- "$cur"))
     elif [[ $verb == help ]]; then
         if ((cword == 2)); then
             COMPREPLY=($(compgen -W 'info pair chunks tags scan overview adm project lock locks decode' -- "$cur"))

@@ -234,6 +234,11 @@ class Usage(CommandTest):
         for arguments, verbs in ((("chunks", "get", "a.wav", "toolong"), "chunks get"), (("info", "--nothing"), "info")):
             self.assertTrue(self.run_command(*arguments, status=2).stderr.decode().endswith(f'\nTry "ktfiles help {verbs}".\n'))
         self.assertTrue(self.run_command("nothing", status=2).stderr.endswith(b'\nTry "ktfiles help".\n'))
+        for arguments in (("inf",), ("help", "INOF")):
+            self.assertIn(b'did you mean "info"?', self.run_command(*arguments, status=2).stderr)
+        self.assertNotIn(b"did you mean", self.run_command("nothing", status=2).stderr)
+        text = self.run_command("help", "info").stdout.decode()
+        self.assertLess(text.index("--check"), text.index("--json"))
         self.assertEqual(self.run_command("-V").stdout, self.run_command("--version").stdout)
 
 

@@ -2,6 +2,7 @@
 
 #include "tool/shared/arguments/ChunkId.h"
 #include "tool/shared/arguments/CoordinationFolder.h"
+#include "tool/shared/arguments/Nearest.h"
 #include "tool/shared/output/Failure.h"
 #include "tool/shared/output/UnseenCharacters.h"
 
@@ -101,7 +102,9 @@ CommandLine::CommandLine()
 Verb& CommandLine::addVerb(const std::string& name, const std::string& description, Verb::Work run, Verb* parent)
 {
     Verb& verb = (parent != nullptr ? *parent : program_).addVerb(name, description, std::move(run));
+    verb.setHeading("Options of every verb");
     addOutputOptions(verb);
+    verb.setHeading("Options");
     return verb;
 }
 
@@ -185,6 +188,11 @@ void CommandLine::addHelpVerb()
         .addTexts("VERB", helpTopics_, "The verb, and what it works on");
 }
 
+UsageError CommandLine::unknownVerb(const std::string& word) const
+{
+    return UsageError("there is no verb \"" + printable(word) + "\"" + didYouMean(word, program_.names()));
+}
+
 bool CommandLine::printHelp() const
 {
     const Verb* topic = &program_;
@@ -193,7 +201,7 @@ bool CommandLine::printHelp() const
         above = topic == &program_ ? program_.name() : above + " " + topic->name();
         topic = topic->find(word);
         if (topic == nullptr)
-            throw UsageError("there is no verb \"" + printable(word) + "\"");
+            throw unknownVerb(word);
     }
     Output::standard().write(topic->help(above));
     return true;
@@ -203,7 +211,7 @@ int CommandLine::parseAndRun(const std::vector<std::string>& arguments)
 {
     try {
         if (!arguments.empty() && !arguments.front().starts_with('-') && program_.find(arguments.front()) == nullptr)
-            throw UsageError("there is no verb \"" + printable(arguments.front()) + "\"");
+            throw unknownVerb(arguments.front());
         const auto [verb, text] = program_.parse(arguments);
         if (verb == &program_) {
             std::fputs(program_.help().c_str(), stderr);

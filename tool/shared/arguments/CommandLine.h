@@ -48,6 +48,7 @@ private:
     void addOutputOptions(Verb& verb);
     void addHelpVerb();
     bool printHelp() const;
+    UsageError unknownVerb(const std::string& word) const;
     int parseAndRun(const std::vector<std::string>& arguments);
 
     Verb program_;

@@ -58,6 +58,13 @@ public:
         return help;
     }
 
+    /// What an option goes with is in its description.
+    std::string make_option_opts(const CLI::Option* option) const override
+    {
+        const std::string text = CLI::Formatter::make_option_opts(option);
+        return text.substr(0, text.find(" Excludes:"));
+    }
+
 private:
     static std::string usageLine(const CLI::App& app, const std::string& name)
     {
@@ -124,6 +131,11 @@ Verb& Verb::addVerb(const std::string& name, const std::string& description, Wor
 void Verb::setFooter(const std::string& text)
 {
     app_->footer(text);
+}
+
+void Verb::setHeading(const std::string& text)
+{
+    app_->option_defaults()->group(text);
 }
 
 Argument Verb::addFlag(const std::string& names, bool& value, const std::string& description)
@@ -194,6 +206,14 @@ bool Verb::isGiven(const std::string& name) const
 const std::string& Verb::name() const
 {
     return app_->get_name();
+}
+
+std::vector<std::string_view> Verb::names() const
+{
+    std::vector<std::string_view> names;
+    for (const std::unique_ptr<Verb>& verb : verbs_)
+        names.push_back(verb->name());
+    return names;
 }
 
 const Verb* Verb::find(const std::string& name) const

@@ -5,6 +5,7 @@
 #include <functional>
 #include <memory>
 #include <string>
+#include <string_view>
 #include <type_traits>
 #include <utility>
 #include <vector>
@@ -49,6 +50,8 @@ public:
     Verb& addVerb(const std::string& name, const std::string& description, Work work);
     /// The last lines of the help.
     void setFooter(const std::string& text);
+    /// The heading in the help under which what is added from now on stands; at first "Options".
+    void setHeading(const std::string& text);
 
     // Options have `names` such as "-q,--quiet", arguments by position one such as "FILE". References must outlive the
     // parsing.
@@ -94,6 +97,8 @@ public:
     const std::string& name() const;
     /// The verb of that name below this one, or null.
     const Verb* find(const std::string& name) const;
+    /// Those below this one.
+    std::vector<std::string_view> names() const;
     /// `above` are the names ahead of this verb's.
     std::string help(const std::string& above = "") const;
 

@@ -319,7 +319,7 @@ TEST(ChunkEdit, TheHeaderFollowsTheSamples)
         EXPECT_EQ(file.Info().frames, 0);
         EXPECT_EQ(file.WriteFrames(samples, 0, 3), kStatusOK);
         EXPECT_EQ(add(file, "note", "x"), 1); // behind samples that the header on disk does not count yet
-        CAudioFileIO another(ref, 0); // to which the file is whole already
+        CAudioFileIO another(ref, 0);         // to which the file is whole already
         EXPECT_EQ(another.Info().frames, 3);
         EXPECT_EQ(another.FindChunk(fourCC("note")), Bytes(1, std::byte{'x'}));
         EXPECT_EQ(file.Close(), kStatusOK);

@@ -268,7 +268,8 @@ class OtherVerbs(LockTest):
             ("--presenter", ["chunks", "add", "a.aiff", "most", "--in-place"], "write"),
             ("--read", ["tags", "set", "a.aiff", "genre=Jazz"], "write"),
             ("--read", ["tags", "copy", "b.aiff", "a.aiff"], "write"),
-            ("--presenter", ["overview", "--store", "a.aiff"], "write"),
+            ("--presenter", ["overview", "--store", "a.aiff"], "read"),
+            ("--read", ["overview", "--store", "a.aiff"], "write"),  # once the overview is made
         ]
         self.loop("a.aiff")
         shutil.copy(MEDIA / "tone-16.aiff", self.folder / "b.aiff")

@@ -27,7 +27,7 @@ using platform::AudioHandle;
 using platform::ConvertingReader;
 using platform::StreamDescription;
 
-constexpr std::int32_t kNotImplemented = -4;
+constexpr std::int32_t kNotOffered = -4;
 constexpr FourCC kFileTypeQuery = fourCC("#fmt");
 constexpr std::uint32_t kSkipPacketCheck = 1;
 constexpr std::size_t kMaxPath = 1023;
@@ -245,17 +245,17 @@ std::int32_t XStreamReadFrames(XStreamRef stream, XStreamReadRequest* request)
 
 std::int32_t XStreamWriteFrames(XStreamRef, XStreamReadRequest*)
 {
-    return kNotImplemented;
+    return kNotOffered;
 }
 
 std::int32_t XStreamReadPackets(XStreamRef, XStreamReadRequest*)
 {
-    return kNotImplemented;
+    return kNotOffered;
 }
 
 std::int32_t XStreamWritePackets(XStreamRef, XStreamReadRequest*)
 {
-    return kNotImplemented;
+    return kNotOffered;
 }
 
 std::int32_t XStreamGetPropertyInfo(XStreamRef stream, std::uint32_t id, std::uint32_t* outSize,

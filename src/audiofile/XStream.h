@@ -1,8 +1,8 @@
 // Audio files read by C callers, in any format that the converting reader decodes, as interleaved linear PCM of the
 // caller's choice. Takes a C99 or a C++ compiler. A stream is used by one thread at a time.
 //
-// Every function returns 0, -50 for a parameter error, -4 when it is not implemented, or another negative or
-// four-character status of the services below.
+// Every function returns 0, -50 for a parameter error, -4 from the three that streams do not offer, or another negative
+// or four-character status of the services below.
 #pragma once
 
 #include "platform/core/Export.h"
@@ -90,7 +90,7 @@ KT_EXPORT int32_t XStreamReadFramesSync(XStreamRef stream, int64_t position, uin
                                         void* buffer, uint32_t* outBytesRead);
 /// The same; it too returns when all is done. On failure the request is as it was.
 KT_EXPORT int32_t XStreamReadFrames(XStreamRef stream, XStreamReadRequest* request);
-/// Not implemented: always -4.
+/// Not offered: always -4.
 KT_EXPORT int32_t XStreamWriteFrames(XStreamRef stream, XStreamReadRequest* request);
 KT_EXPORT int32_t XStreamReadPackets(XStreamRef stream, XStreamReadRequest* request);
 KT_EXPORT int32_t XStreamWritePackets(XStreamRef stream, XStreamReadRequest* request);

@@ -24,8 +24,8 @@ KT_EXPORT Places& places();
 /// The Library folders of the user, the machine, the network and the system, in this order, whether or not they exist.
 KT_EXPORT std::vector<std::string> libraryFolders();
 
-/// Whether the item lies in a folder for trashed files, by the rules of the desktop (Trash specification 1.0): the home
-/// trash, or ".Trash/UID" and ".Trash-UID" at the top of its volume.
+/// Whether the item lies in a folder for trashed files, by the rules of the desktop (freedesktop.org, Trash 1.0): the
+/// home trash, or ".Trash/UID" and ".Trash-UID" at the top of its volume.
 KT_EXPORT bool isInTrash(const String& path);
 
 /// Whether the desktop does not show the item itself: its name begins with a dot, or its folder's ".hidden" lists it.

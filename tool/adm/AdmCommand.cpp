@@ -116,12 +116,8 @@ public:
                     areFine = areFine && found.empty();
                 };
             },
-            [&](const std::string& path, const std::string& text) {
-                if (form_ == Form::json)
-                    json_.addFailure(path, text);
-            });
-        if (form_ == Form::json)
-            json_.finish();
+            [&](const std::string& path, const std::string& text) { json_.addFailure(path, text); });
+        json_.finish();
         return good && areFine;
     }
 

@@ -62,12 +62,10 @@ void DecodeReport::add(const std::string& path, const DecodeResult& result)
 
 void DecodeReport::addFailure(const std::string& path, const std::string& text)
 {
-    if (form_ == Form::json)
-        json_.addFailure(path, text);
+    json_.addFailure(path, text);
 }
 
 void DecodeReport::finish()
 {
-    if (form_ == Form::json)
-        json_.finish();
+    json_.finish();
 }

@@ -64,16 +64,8 @@ public:
                 output_.print("{}: {}{}; {}\n", printable(path), placeText(problem), problem.words.text,
                               problem.words.effect);
     }
-    void addFailure(const std::string& path, const std::string& text)
-    {
-        if (form_ == Form::json)
-            json_.addFailure(path, text);
-    }
-    void finish()
-    {
-        if (form_ == Form::json)
-            json_.finish();
-    }
+    void addFailure(const std::string& path, const std::string& text) { json_.addFailure(path, text); }
+    void finish() { json_.finish(); }
     bool isGood() const { return isGood_; }
 
 private:

@@ -132,12 +132,10 @@ void OverviewReport::addJson(const std::string& path, const FileOverview& overvi
 
 void OverviewReport::addFailure(const std::string& path, const std::string& text)
 {
-    if (form_ == Form::json)
-        json_.addFailure(path, text);
+    json_.addFailure(path, text);
 }
 
 void OverviewReport::finish()
 {
-    if (form_ == Form::json)
-        json_.finish();
+    json_.finish();
 }

@@ -42,16 +42,11 @@ public:
         }
     }
 
-    void addFailure(const std::string& path, const std::string& text)
-    {
-        if (form_ == Form::json)
-            json_.addFailure(path, text);
-    }
+    void addFailure(const std::string& path, const std::string& text) { json_.addFailure(path, text); }
 
     void finish()
     {
-        if (form_ == Form::json)
-            json_.finish();
+        json_.finish();
         table_.print(output_, color_);
     }
 

@@ -37,17 +37,9 @@ public:
         first_ = false;
     }
 
-    void addFailure(const std::string& path, const std::string& text)
-    {
-        if (form_ == Form::json)
-            json_.addFailure(path, text);
-    }
+    void addFailure(const std::string& path, const std::string& text) { json_.addFailure(path, text); }
 
-    void finish()
-    {
-        if (form_ == Form::json)
-            json_.finish();
-    }
+    void finish() { json_.finish(); }
 
 private:
     void addTable(const std::string& path, const LoopTags& tags)

@@ -1,4 +1,4 @@
-// Published sources: Multimedia Programming Interface and Data Specifications 1.0, EBU Tech 3306 (RF64), AIFF 1.3 and
+// Published sources: RIFF as published in August 1991, EBU Tech 3306 (RF64), AIFF 1.3 and
 // the AIFF-C draft of 1991-08-26, the published format description of CAF, version 1.0.
 #include "media/containers/NewContainer.h"
 

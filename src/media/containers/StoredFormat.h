@@ -1,6 +1,6 @@
 // What containers say of their samples: "fmt ", "COMM" and "desc", and how long a chunk of samples is whose size was
 // never filled in. Whoever describes a file asks here, so that what one tells of is what the other reads. Published
-// sources: Multimedia Programming Interface and Data Specifications 1.0, RFC 2361 (format tags), AIFF 1.3, the AIFF-C
+// sources: RIFF as published in August 1991, RFC 2361 (format tags), AIFF 1.3, the AIFF-C
 // draft of 1991-08-26, of CAF the published format description, version 1.0, and of AU the manual page audio(4).
 #pragma once
 

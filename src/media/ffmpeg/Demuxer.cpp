@@ -169,18 +169,20 @@ bool Demuxer::seek(std::int64_t time)
     return av_seek_frame(context_.get(), stream_, time, AVSEEK_FLAG_BACKWARD) >= 0;
 }
 
-std::size_t Demuxer::readAt(std::uint64_t position, std::byte* to, std::size_t count)
+std::int32_t Demuxer::readAt(std::uint64_t position, std::byte* to, std::size_t count, std::size_t& got)
 {
+    constexpr std::size_t most = 4096;
+    got = 0;
     AVIOContext* const file = context_->pb;
-    if (file == nullptr)
-        return 0;
+    if (file == nullptr || position >= size())
+        return kStatusOK;
     const std::int64_t before = avio_tell(file);
-    int got = 0;
-    if (position <= INT64_MAX && avio_seek(file, static_cast<std::int64_t>(position), SEEK_SET) >= 0)
-        got =
-            avio_read(file, reinterpret_cast<unsigned char*>(to), static_cast<int>(std::min<std::size_t>(count, 4096)));
+    std::int64_t result = avio_seek(file, static_cast<std::int64_t>(position), SEEK_SET);
+    if (result >= 0)
+        result = avio_read(file, reinterpret_cast<unsigned char*>(to), static_cast<int>(std::min(count, most)));
     avio_seek(file, before, SEEK_SET);
-    return static_cast<std::size_t>(std::max(got, 0));
+    got = static_cast<std::size_t>(std::max<std::int64_t>(result, 0));
+    return result >= 0 || result == AVERROR_EOF ? kStatusOK : PosixErrorToOSErr(AVUNERROR(static_cast<int>(result)));
 }
 
 std::uint64_t Demuxer::size() const

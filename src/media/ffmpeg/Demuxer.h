@@ -30,8 +30,9 @@ public:
     bool read(AVPacket& packet, std::int32_t& status);
     /// To a packet at or before a time, in the stream's units, as well as the file lets it be found.
     bool seek(std::int64_t time);
-    /// Bytes of the file itself, up to `count`, and their number; the packets go on where they were.
-    std::size_t readAt(std::uint64_t position, std::byte* to, std::size_t count);
+    /// Bytes of the file itself, up to `count`, at most 4,096, fewer only at its end; the packets go on where they
+    /// were. 0, or the status of a read that failed.
+    std::int32_t readAt(std::uint64_t position, std::byte* to, std::size_t count, std::size_t& got);
     /// The file's length in bytes; 0 when it cannot be told.
     std::uint64_t size() const;
     /// To the first packet, in the state of a newly opened file.

@@ -84,8 +84,9 @@ std::unique_ptr<FileDecoder> FileDecoder::open(const char* path, std::int32_t& s
         return nullptr;
     std::unique_ptr<CorrectionFile> corrections = CorrectionFile::beside(path, demuxer);
     std::unique_ptr<FileDecoder> decoder(new FileDecoder(std::move(demuxer), std::move(corrections)));
-    decoder->musepack_ = readMusepackInfo(decoder->demuxer_);
-    status = decoder->begin();
+    status = readMusepackInfo(decoder->demuxer_, decoder->musepack_);
+    if (status == kStatusOK)
+        status = decoder->begin();
     if (status == kStatusOK)
         status = decoder->describeAsDecoded();
     return status == kStatusOK ? std::move(decoder) : nullptr;

@@ -2,6 +2,7 @@
 
 #include "media/ffmpeg/Demuxer.h"
 #include "platform/core/Bytes.h"
+#include "platform/core/Status.h"
 
 #include <algorithm>
 #include <array>
@@ -56,34 +57,41 @@ std::uint64_t endOfTag(BytesView start)
 
 } // namespace
 
-std::optional<MusepackInfo> readMusepackInfo(Demuxer& demuxer)
+std::int32_t readMusepackInfo(Demuxer& demuxer, std::optional<MusepackInfo>& info)
 {
     constexpr int mostPackets = 16; // ahead of the header, which should be the first
     constexpr std::size_t keySize = 2;
+    info.reset();
     if (demuxer.name() != "mpc8")
-        return {};
+        return kStatusOK;
     std::array<std::byte, 32> bytes;
+    std::int32_t status = kStatusOK; // behind a read that failed nothing is found
     const auto at = [&](std::uint64_t position) {
-        return BytesView(bytes).first(demuxer.readAt(position, bytes.data(), bytes.size()));
+        std::size_t got = 0;
+        if (status == kStatusOK)
+            status = demuxer.readAt(position, bytes.data(), bytes.size(), got);
+        return BytesView(bytes).first(got);
     };
     std::uint64_t position = endOfTag(at(0));
     if (const BytesView magic = at(position); magic.size() < 4 || textOf(magic.first(4)) != "MPCK")
-        return {};
+        return status;
     position += 4;
     for (int i = 0; i < mostPackets; ++i) {
         const BytesView packet = at(position);
         if (packet.size() < keySize)
-            return {};
+            break;
         BytesView body = packet.subspan(keySize);
         const auto size = takeNumber(body); // of the whole packet
         const std::size_t headerSize = packet.size() - body.size();
         if (!size || *size < headerSize || *size > demuxer.size())
-            return {};
-        if (textOf(packet.first(keySize)) == "SH")
-            return infoOf(body.first(std::min<std::size_t>(body.size(), static_cast<std::size_t>(*size) - headerSize)));
+            break;
+        if (textOf(packet.first(keySize)) == "SH") {
+            info = infoOf(body.first(std::min<std::size_t>(body.size(), static_cast<std::size_t>(*size) - headerSize)));
+            break;
+        }
         position += *size;
     }
-    return {};
+    return status;
 }
 
 } // namespace platform::ffmpeg

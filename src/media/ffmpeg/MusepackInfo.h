@@ -14,7 +14,8 @@ struct MusepackInfo {
     std::uint64_t frames = 0; // at least 1
 };
 
-/// Of a file of stream version 8, a tag ahead of it or not; none for others, and where the header does not say.
-std::optional<MusepackInfo> readMusepackInfo(Demuxer& demuxer);
+/// Of a file of stream version 8, a tag ahead of it or not; none for others, and where the header does not say. 0, or
+/// the status of a read that failed.
+std::int32_t readMusepackInfo(Demuxer& demuxer, std::optional<MusepackInfo>& info);
 
 } // namespace platform::ffmpeg

@@ -1,4 +1,4 @@
-// Vorbis in Ogg streams (the Vorbis I specification of Xiph.Org, chapters 1 and 4).
+// Vorbis in Ogg streams (Vorbis I by Xiph.Org, chapters 1 and 4).
 #pragma once
 
 #include "media/packets/OggCoding.h"

@@ -13,7 +13,7 @@ namespace {
 
 constexpr std::size_t kMaxDesktopEntrySize = 64 * 1024;
 
-/// The keys under which a desktop entry (Desktop Entry Specification 1.5) may hold the name, best first: for
+/// The keys under which a desktop entry (freedesktop.org, Desktop Entry 1.5) may hold the name, best first: for
 /// "de_AT.UTF-8@euro" that is Name[de_AT@euro], Name[de_AT], Name[de@euro], Name[de], Name.
 std::vector<std::string> nameKeys()
 {

@@ -26,13 +26,15 @@ void JsonRecords::end()
 
 void JsonRecords::addFailure(const std::string& path, const std::string& text)
 {
+    if (shape_ == JsonShape::none)
+        return;
     begin().beginObject().member("path", path).member("error", text).endObject();
     end();
 }
 
 void JsonRecords::finish()
 {
-    if (shape_ == JsonShape::lines)
+    if (shape_ != JsonShape::array)
         return;
     beginArray();
     json_.endArrayOfLines().endLine();

@@ -12,6 +12,8 @@ public:
     JsonWriter& begin();
     /// Behind each record. A line is written through at once, so that who reads it can go on.
     void end();
+    // Nothing where no JSON is asked for:
+
     /// A record of a file that failed.
     void addFailure(const std::string& path, const std::string& text);
     /// Behind the last; there may have been none.

@@ -1,10 +1,10 @@
 """ktfiles info --check, --md5 and --sha256: what is off in files, and digests of their sound."""
 import hashlib
-import struct
+import json
 import subprocess
 import unittest
 
-from command import KTFILES, CommandTest, caf, chunk, needs_decoders, wave
+from command import KTFILES, MEDIA, CommandTest, caf, chunk, needs_decoders, wave
 
 
 class Check(CommandTest):
@@ -62,6 +62,21 @@ class Check(CommandTest):
         # What cannot be read at all is an error as ever.
         self.write("none.wav", b"")
         self.assertEqual(self.failure("info", "--check", "none.wav"), "ktfiles: none.wav: is empty\n")
+
+    def test_tells_of_every_file_that_info_calls_cut(self):
+        contents = {"wav": wave(chunk(b"note", b"odd")), "caf": caf((b"note", b"odd"))}
+        for name in ("kick-24-rf64.wav", "tone-adpcm.wav", "tone-16.aiff", "tone-fl32.aifc", "pluck-24-le.caf"):
+            contents[name] = (MEDIA / name).read_bytes()
+        for name, content in contents.items():
+            for part in range(1, 17):
+                self.write(f"{part}.{name}", content[:len(content) * part // 16])
+        info, check = ({record["path"]: record for record in json.loads(
+            subprocess.run([KTFILES, "info", "--json", *options, "."], cwd=self.folder, capture_output=True).stdout)}
+            for options in ((), ("--check",)))
+        cut = [path for path, record in info.items() if record.get("isWhole") is False]
+        self.assertGreater(len(cut), 50)
+        for path in cut:
+            self.assertTrue(check[path].get("findings"), path)
 
     @needs_decoders
     def test_compressed_files_that_lack_some(self):

@@ -30,6 +30,30 @@ class List(CommandTest):
         several = self.json("chunks", "a.wav", "missing", "d.caf", status=1)
         self.assertEqual([item.get("error", item["path"]) for item in several], ["a.wav", "file not found", "d.caf"])
 
+    def test_forms_of_lists_and_sizes_beyond_the_file(self):
+        info = chunk(b"LIST", b"INFO" + chunk(b"INAM", b"x\0"))
+        self.write("a.wav", wave(info, chunk(b"LIST", b"ad"), chunk(b"LIST", b"a\n\xe4l"), chunk(b"note", b"abc", size=0x7FFFFFFE)))
+        self.assertEqual(self.record("chunks", "a.wav")["chunks"][2:], [
+            {"id": "LIST", "form": "INFO", "offset": 244, "size": 14}, {"id": "LIST", "offset": 266, "size": 2},
+            {"id": "LIST", "form": "a\\x0A\\xE4l", "offset": 276, "size": 4},
+            {"id": "note", "offset": 288, "size": 0x7FFFFFFE, "presentBytes": 4}])
+        self.assertEqual(self.lines("chunks", "a.wav")[2:4], ["LIST\t244\t14\tINFO", "LIST\t266\t2"])
+        table, status = self.on_terminal("chunks", "a.wav")
+        self.assertEqual((status, table.splitlines()[-4:-3], table.splitlines()[-1]), (
+            0, ["LIST (INFO)     244      14"], "note            288  2147483646, 4 of them in the file"))
+        # Every kind of container; in what CAF leaves open all is there.
+        samples = chunk(b"COMM", bytes(18), ">") + chunk(b"SSND", b"abc", ">", size=99)
+        for name, content, present in (("b.aiff", b"FORM" + struct.pack(">I", 200) + b"AIFF" + samples, 4),
+                                       ("c.caf", caf((b"info", b"x"))[:-200], 4), ("d.caf", caf(data_size=-1), None),
+                                       ("e.wav", b"RF64" + b"\xff" * 4 + b"WAVE" + chunk(b"ds64", struct.pack("<QQQI", 60, 90, 0, 0)) +
+                                        chunk(b"data", b"ab", size=0xFFFFFFFF), 2),
+                                       ("f.wav", b"RIFX" + struct.pack(">I", 40) + b"WAVE" + chunk(b"data", b"ab", ">", size=90), 2),
+                                       ("g.rx2", b"CAT " + struct.pack(">I", 64) + b"REX2" + chunk(b"HEAD", bytes(20), ">") +
+                                        chunk(b"CAT ", b"SLCL", ">", size=80), 4)):
+            self.write(name, content)
+            last = self.record("chunks", name)["chunks"][-1]
+            self.assertEqual((last.get("presentBytes"), last.get("form")), (present, "SLCL" if name == "g.rx2" else None), name)
+
     @needs_decoders
     def test_what_has_no_chunks_loads_no_decoder(self):
         def loaded(*arguments):

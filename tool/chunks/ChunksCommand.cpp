@@ -8,9 +8,24 @@
 #include "tool/shared/output/JsonRecords.h"
 #include "tool/shared/output/Table.h"
 
+#include <algorithm>
+#include <array>
 #include <optional>
 
 namespace {
+
+/// What the body of a chunk begins with that holds chunks of its own: what kind of them; 0 of all others. In Wave64 the
+/// name that its identifier begins with.
+FourCC formOf(CAudioFileIO& file, const ContainerExtent& extent, const ChunkEntry& chunk)
+{
+    static constexpr std::array lists{fourCC("LIST"), fourCC("list"), fourCC("FORM"), fourCC("CAT ")};
+    std::array<std::byte, sizeof(FourCC)> form{};
+    const std::int64_t there = std::min(chunk.size, extent.fileLength - chunk.body);
+    if (std::find(lists.begin(), lists.end(), chunk.id) == lists.end() || there < std::ssize(form))
+        return 0;
+    requireOK(file.Read(form.data(), chunk.body, std::ssize(form), nullptr));
+    return loadBE<FourCC>(form.data());
+}
 
 // Writes the list of one file chunk by chunk: files of hundreds of thousands of chunks are listed, not held.
 class ChunkListWriter {
@@ -39,28 +54,32 @@ public:
         } else if (form_ == Form::table) {
             output_.print("{}{}  {}, {} bytes\n", follows_ ? "\n" : "", printable(path_), fourCCText(extent.id),
                           extent.end);
-            const int width = std::max(static_cast<int>(fmt::formatted_size("{}", extent.fileLength)), 6);
-            table_.emplace(std::vector<Table::Column>{
-                {"ID", Align::left, 4}, {"OFFSET", Align::right, width}, {"SIZE", Align::right, width}});
+            table_.emplace(std::vector<Table::Column>{{"ID", Align::left, kWidestId},
+                                                      {"OFFSET", Align::right, numberWidth()},
+                                                      {"SIZE", Align::right, numberWidth()}});
             table_->printTitles(output_, color_);
         }
     }
 
-    bool add(const ChunkEntry& chunk)
+    /// `form` is 0 for a chunk that has none.
+    bool add(const ChunkEntry& chunk, FourCC form)
     {
-        const std::string id = fourCCText(chunk.id);
-        if (form_ == Form::json)
-            list_->newLine()
-                .beginObject()
-                .member("id", id)
-                .member("offset", chunk.offset)
-                .member("size", chunk.size)
-                .endObject();
-        else if (form_ == Form::table)
-            table_->printRow(output_, {id, std::to_string(chunk.offset), std::to_string(chunk.size)});
-        else if (form_ == Form::lines)
-            output_.print("{}{}{}\t{}\t{}\n", several_ ? printable(path_) : "", several_ ? "\t" : "", id, chunk.offset,
-                          chunk.size);
+        const std::string id = fourCCText(chunk.id), formText = form != 0 ? fourCCText(form) : "";
+        const std::int64_t there = std::max<std::int64_t>(extent_.fileLength - chunk.body, 0);
+        const bool isCut = chunk.size > there;
+        if (form_ == Form::json) {
+            JsonWriter& json = list_->newLine().beginObject().member("id", id).knownMember("form", formText);
+            json.member("offset", chunk.offset).member("size", chunk.size);
+            json.knownMember("presentBytes", isCut ? std::optional(there) : std::nullopt).endObject();
+        } else if (form_ == Form::table) {
+            const std::string name = form != 0 ? fmt::format("{} ({})", id, formText) : id;
+            const std::string rest = isCut ? fmt::format(", {} of them in the file", there) : "";
+            table_->printRow(output_, {name, std::to_string(chunk.offset),
+                                       fmt::format("{:>{}}{}", chunk.size, numberWidth(), rest)});
+        } else if (form_ == Form::lines) {
+            output_.print("{}{}{}\t{}\t{}{}{}\n", several_ ? printable(path_) : "", several_ ? "\t" : "", id,
+                          chunk.offset, chunk.size, form != 0 ? "\t" : "", formText);
+        }
         return !output_.failed();
     }
 
@@ -74,6 +93,10 @@ public:
     }
 
 private:
+    static constexpr int kWidestId = 11; // "LIST (INFO)"
+
+    int numberWidth() const { return std::max(static_cast<int>(fmt::formatted_size("{}", extent_.fileLength)), 6); }
+
     void endList(const std::string& error)
     {
         list_->endArrayOfLines();
@@ -106,7 +129,7 @@ std::string listFile(const std::string& path, ChunkListWriter& writer, bool quie
         [&](const ChunkEntry& chunk) {
             if (!std::exchange(begun, true))
                 writer.begin(extent);
-            return writer.add(chunk);
+            return writer.add(chunk, formOf(file, extent, chunk));
         },
         &extent);
     if (status != kStatusOK && !begun)

@@ -20,6 +20,7 @@ ARROWS = {
     "media/ffmpeg": {"media/decoding"},
     "files": {"platform"},
     "loops/tagging": {"platform/core"},
+    "audiofile/metadata": {"platform/core"},
     "audiofile": {"files", "loops/tagging", "media/decoding", "platform"},
     "loops": {"audiofile", "files", "loops/tagging", "media/decoding", "platform"},
     "loops/overview": {"audiofile", "files", "media/samples", "platform"},

@@ -1,0 +1,55 @@
+// The chunk "LIST" of WAVE files: chunks in a chunk. InfoList and AssociatedDataList say what those are. Page:
+// docs/formats/wave-metadata.md.
+#pragma once
+
+#include "platform/core/Bytes.h"
+#include "platform/core/Export.h"
+#include "platform/core/FourCC.h"
+
+#include <bit>
+#include <optional>
+#include <string>
+#include <vector>
+
+/// One chunk of a list: an id, a size of 4 bytes, the body, and a byte more when that is of odd size.
+struct ListItem {
+    FourCC id = 0;
+    Bytes body;                // what is there of it
+    std::uint32_t missing = 0; // bytes that the size states beyond the end of the list; of the last item only
+    std::byte pad{0};          // behind a body of odd size
+    bool isPadded = true;      // false where the writer left that byte out
+    friend bool operator==(const ListItem&, const ListItem&) = default;
+};
+
+/// Published source: Multimedia Programming Interface and Data Specifications 1.0, LIST Chunk. What is not changed is
+/// written as it was read, whatever its order and its padding.
+class KT_EXPORT ListChunk {
+public:
+    /// The items in their order, those too whose id says nothing to the reader.
+    const std::vector<ListItem>& items() const { return items_; }
+    FourCC form() const { return form_; }
+
+    /// In the byte order of the list.
+    Bytes write() const;
+    friend bool operator==(const ListChunk&, const ListChunk&) = default;
+
+protected:
+    ListChunk(FourCC form, std::endian order) : form_(form), order_(order) {}
+    /// False of a body that does not begin with the form.
+    bool readItems(BytesView body);
+    std::endian order() const { return order_; }
+    void replaceBody(std::size_t index, Bytes body);
+    void insert(std::size_t index, FourCC id, Bytes body);
+    void erase(std::size_t index);
+
+private:
+    FourCC form_;
+    std::endian order_; // of its numbers
+    std::vector<ListItem> items_;
+    Bytes behind_; // fewer bytes than an item has
+};
+
+/// `text` up to its first NUL, which not every writer puts there.
+KT_EXPORT std::string textUpToNUL(BytesView text);
+/// `text` and a NUL.
+KT_EXPORT Bytes textAndNUL(std::string_view text);

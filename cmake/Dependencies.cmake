@@ -10,3 +10,7 @@ find_package(Threads REQUIRED)
 # Decoders of compressed audio, in a module of their own; without these packages the library has none.
 pkg_check_modules(decoding IMPORTED_TARGET libavformat libavcodec libswresample libavutil wavpack)
 option(KTFILES_WITH_FFMPEG "Build the decoder module" ${decoding_FOUND})
+
+# Tags of formats that the library does not annotate, in another module; without TagLib the library has none.
+pkg_check_modules(taglib IMPORTED_TARGET taglib)
+option(KTFILES_WITH_TAGLIB "Build the module of tags" ${taglib_FOUND})

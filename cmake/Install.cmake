@@ -1,14 +1,18 @@
 # What `make install` puts where: the library, its headers by room, the CMake package, the pkg-config file, the command.
-# Components, which are also the packages: runtime, development, command, and decoders where the module is built.
+# Components, which are also the packages: runtime, development, command, decoders and tags where the modules are built.
 
 include(CMakePackageConfigHelpers)
 
 install(TARGETS KTFiles EXPORT KTFilesTargets
     LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR} COMPONENT runtime NAMELINK_COMPONENT development)
 
-# Beside the library, where it looks for the module.
+# Beside the library, where it looks for the modules.
 if(TARGET ktfiles_decoders)
     install(TARGETS ktfiles_decoders LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR}/ktfiles COMPONENT decoders)
+endif()
+
+if(TARGET ktfiles_tags)
+    install(TARGETS ktfiles_tags LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR}/ktfiles COMPONENT tags)
 endif()
 
 # The headers of implementations (platform/posix/ and the like) are nobody's business.
@@ -26,6 +30,7 @@ set(media_headers
     media/containers/StoredFormat.h
     media/packets/FileEnds.h media/packets/PacketTable.h
     media/decoding/CompressedAudio.h media/decoding/ConvertingReader.h
+    media/tags/EmbeddedTags.h
     media/userdata/AudioFileService.h)
 foreach(header IN LISTS media_headers)
     cmake_path(GET header PARENT_PATH room)

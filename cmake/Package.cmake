@@ -1,4 +1,4 @@
-# `cpack -G DEB`: libktfiles0, libktfiles-dev, ktfiles, and libktfiles-ffmpeg where the decoder module is built.
+# `cpack -G DEB`: libktfiles0, libktfiles-dev, ktfiles, libktfiles-ffmpeg and libktfiles-taglib where their modules are built.
 
 set(CPACK_PACKAGE_NAME ktfiles)
 set(CPACK_PACKAGE_VENDOR "KTFiles")
@@ -21,12 +21,22 @@ set(CPACK_COMPONENT_RUNTIME_DESCRIPTION "The shared library")
 
 if(TARGET ktfiles_decoders)
     list(APPEND CPACK_COMPONENTS_ALL decoders)
-    set(CPACK_DEBIAN_RUNTIME_PACKAGE_RECOMMENDS libktfiles-ffmpeg)
+    list(APPEND recommended libktfiles-ffmpeg)
     set(CPACK_DEBIAN_DECODERS_PACKAGE_NAME libktfiles-ffmpeg)
     set(CPACK_DEBIAN_DECODERS_PACKAGE_SECTION libs)
     set(CPACK_DEBIAN_DECODERS_PACKAGE_DEPENDS "libktfiles${PROJECT_VERSION_MAJOR} (= ${PROJECT_VERSION})")
     set(CPACK_COMPONENT_DECODERS_DESCRIPTION "Decoders of compressed audio for the shared library")
 endif()
+
+if(TARGET ktfiles_tags)
+    list(APPEND CPACK_COMPONENTS_ALL tags)
+    list(APPEND recommended libktfiles-taglib)
+    set(CPACK_DEBIAN_TAGS_PACKAGE_NAME libktfiles-taglib)
+    set(CPACK_DEBIAN_TAGS_PACKAGE_SECTION libs)
+    set(CPACK_DEBIAN_TAGS_PACKAGE_DEPENDS "libktfiles${PROJECT_VERSION_MAJOR} (= ${PROJECT_VERSION})")
+    set(CPACK_COMPONENT_TAGS_DESCRIPTION "Tags of compressed audio for the shared library")
+endif()
+list(JOIN recommended ", " CPACK_DEBIAN_RUNTIME_PACKAGE_RECOMMENDS)
 
 set(CPACK_DEBIAN_DEVELOPMENT_PACKAGE_NAME libktfiles-dev)
 set(CPACK_DEBIAN_DEVELOPMENT_PACKAGE_SECTION libdevel)

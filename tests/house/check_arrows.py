@@ -18,6 +18,8 @@ ARROWS = {
     "media/userdata": {"media/containers", "platform"},
     "media/decoding": {"media/packets", "media/userdata", "platform"},
     "media/ffmpeg": {"media/decoding"},
+    "media/tags": {"media/containers", "platform"},
+    "media/taglib": {"media/tags"},
     "files": {"platform"},
     "loops/tagging": {"platform/core"},
     "audiofile/metadata": {"platform/core"},

@@ -1,4 +1,5 @@
-"""Checks that the decoder module, and FFmpeg with it, is loaded by the first file that needs it and by nothing before.
+"""Checks that the decoder module, and FFmpeg with it, is loaded by the first file that needs it and by nothing before; the module
+of tags by none of these.
 
 Usage: check_loading.py LIBRARY LINEAR_PCM_FILE COMPRESSED_FILE
 """
@@ -23,10 +24,11 @@ def read(path):
 
 def decoders():
     maps = pathlib.Path("/proc/self/maps").read_text(encoding="utf-8")
-    return sorted(set(re.findall(r"\S*/lib(?:avcodec|avformat|ktfiles-decoders)[^/\n]*", maps)))
+    return sorted(set(re.findall(r"\S*/lib(?:avcodec|avformat|ktfiles-decoders|tag|ktfiles-tags)[^/\n]*", maps)))
 
 
 read(plain)
 assert not decoders(), f"linear PCM loads {decoders()}"
 read(compressed)
+assert not [name for name in decoders() if "tag" in name], decoders()
 assert len(decoders()) >= 3, f"only {decoders()} are there: the check sees nothing"

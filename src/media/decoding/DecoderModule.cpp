@@ -1,39 +1,19 @@
 #include "media/decoding/DecoderModule.h"
 
+#include "platform/LoadedModule.h"
 #include "platform/core/Status.h"
 
 #include <cmath>
-#include <dlfcn.h>
 
 namespace platform {
 
 namespace {
 
-constexpr const char* kModule = "ktfiles/libktfiles-decoders.so";
+constexpr const char* kModule = "libktfiles-decoders.so";
 constexpr const char* kSymbol = "ktfiles_decoderModule";
 constexpr const char* kPackage = "libktfiles-ffmpeg";
 
 const DecoderModule* replacement = nullptr;
-
-/// The folder of the library, or of the program that it is linked into, with a slash; empty when it is not known.
-std::string ownFolder()
-{
-    Dl_info info;
-    if (dladdr(reinterpret_cast<const void*>(&openWithDecoderModule), &info) == 0 || info.dli_fname == nullptr)
-        return {};
-    const std::string path = info.dli_fname;
-    return path.substr(0, path.rfind('/') + 1);
-}
-
-/// Null when there is no module. Once loaded it stays: its decoders are anybody's.
-const DecoderModule* loadModule()
-{
-    const std::string folder = ownFolder();
-    if (folder.empty()) // what follows would be looked for in the system's folders
-        return nullptr;
-    void* library = dlopen((folder + kModule).c_str(), RTLD_NOW | RTLD_LOCAL | RTLD_NODELETE);
-    return library != nullptr ? static_cast<const DecoderModule*>(dlsym(library, kSymbol)) : nullptr;
-}
 
 /// No way was found: says so in `status`, which may have a reason of its own, and in `error`.
 void failWith(std::int32_t& status, Error* error, const char* reason)
@@ -47,7 +27,7 @@ void failWith(std::int32_t& status, Error* error, const char* reason)
 void failWithoutModule(std::int32_t& status, Error* error, const std::string& what)
 {
     status = AudioHandle::kFormatNotSupported;
-    fail(error, ErrorDomain::status, status, what + " " + kModule + " (install " + kPackage + ")");
+    fail(error, ErrorDomain::status, status, what + " ktfiles/" + kModule + " (install " + kPackage + ")");
 }
 
 } // namespace
@@ -55,7 +35,7 @@ void failWithoutModule(std::int32_t& status, Error* error, const std::string& wh
 const DecoderModule* decoderModule()
 {
     const auto load = [] {
-        static const DecoderModule* const loaded = loadModule();
+        static const auto* const loaded = static_cast<const DecoderModule*>(loadModule(kModule, kSymbol));
         return loaded;
     };
     const DecoderModule* module = replacement != nullptr ? replacement : load();

@@ -30,5 +30,5 @@ def decoders():
 read(plain)
 assert not decoders(), f"linear PCM loads {decoders()}"
 read(compressed)
-assert not [name for name in decoders() if "tag" in name], decoders()
+assert not [name for name in decoders() if "tag" in pathlib.Path(name).name], decoders()
 assert len(decoders()) >= 3, f"only {decoders()} are there: the check sees nothing"

@@ -5,6 +5,7 @@
 #include "media/containers/ByteSource.h"
 #include "platform/core/Bytes.h"
 #include "platform/core/Error.h"
+#include "platform/core/Export.h"
 
 #include <cstdint>
 #include <string>
@@ -34,10 +35,10 @@ struct EmbeddedTag {
 /// and for one without tags. By the module "ktfiles/libktfiles-tags.so" beside the library; without it
 /// AudioHandle::kFormatNotSupported, and `error` (which may be null) names what to install. Else 0, or the status of a
 /// read that failed.
-std::int32_t readEmbeddedTags(const ByteSource& bytes, std::uint64_t length, std::vector<EmbeddedTag>& tags,
-                              Error* error);
+KT_EXPORT std::int32_t readEmbeddedTags(const ByteSource& bytes, std::uint64_t length, std::vector<EmbeddedTag>& tags,
+                                        Error* error);
 /// The same of an ID3v2 tag alone, as WAVE ("id3 ") and AIFF ("ID3 ") files have it in a chunk.
-std::int32_t readID3Chunk(BytesView chunk, std::vector<EmbeddedTag>& tags, Error* error);
+KT_EXPORT std::int32_t readID3Chunk(BytesView chunk, std::vector<EmbeddedTag>& tags, Error* error);
 
 /// What the module exports as "ktfiles_tagModule". Its function throws nothing.
 struct TagModule {

@@ -8,7 +8,7 @@ _ktfiles()
     local common='--json --jsonl --quiet --color --coordination --help' edit='--in-place --dry-run --backup --keep-times --timeout'
     local files='--files-from --null'
     local keys='beatCount midiRootNote keyType signatureTop signatureBottom loopFileType instrumentType
-        instrumentSubType genre descriptors title artist copyright comments transients key mode signature'
+        instrumentSubType genre descriptors title artist copyright comments transients key mode signature beats category subCategory kind'
     local projects='media dirs backup restore settle rename-alternative'
     local verb=${words[1]} object=${words[2]}
 

@@ -37,7 +37,12 @@ class Scan(CommandTest):
         self.assertEqual(self.paths("lib/"), self.paths("lib"))
         self.assertEqual(self.json("scan", "lib/b.aif"), self.json("tags", "lib/b.aif"))
         text, status = self.on_terminal("scan", "lib", NO_COLOR="1")
-        self.assertEqual([line.split()[-1] for line in text.splitlines()], ["FILE", *self.paths("lib")])
+        *table, count = text.splitlines()
+        self.assertEqual([line.split()[-1] for line in table], ["FILE", *self.paths("lib")])
+        self.assertEqual(count, "4 loops among 8 files")
+        self.assertEqual(self.run_command("scan", "lib").stderr, b"")
+        self.assertEqual(self.on_terminal("scan", "lib/README.md")[0], "no loops among 1 file\n")
+        self.assertEqual(self.on_terminal("scan", "--quiet", "lib")[0], "")
         rows = list(csv.DictReader(io.StringIO(self.run_command("scan", "--csv", "lib").stdout.decode(), newline="")))
         self.assertEqual([(row["path"], row["genre"], row["beatCount"]) for row in rows],
                          [(item["path"], item["genre"], "4") for item in self.json("scan", "lib")])

@@ -7,7 +7,7 @@ import subprocess
 import unittest
 from random import Random
 
-from command import MEDIA, CommandTest, caf
+from command import KTFILES, MEDIA, CommandTest, caf
 
 SAMPLES = {"a.aiff": "tone-16.aiff", "a.caf": "pluck-24-le.caf"}
 PATCH = b"patch bytes"
@@ -231,6 +231,95 @@ class Copy(TagsTest):
         self.assertEqual(shown["transients"], [{"type": 1, "frame": 7}])
         self.run_command("tags", "remove", "a.aiff")
         self.assertIn("has no loop tags", self.failure("tags", "copy", "a.aiff", "a.caf"))
+
+
+class GoesBack(TagsTest):
+    """What `tags` prints goes back into `tags set`."""
+
+    TEXTS = ["plain", "it's \"quoted\" \\ back\\n", " spaces at both ends ", "two\nlines\n", "tab\there", "$'x'", "$x `y` $(z)", "\x1b[1m", "é\u202e",
+             "a=b, c/d", "$'", "'", "\\'", "ends in \\", "*", "-n", "\x7f\u0085"]
+    FIELDS = {"beatCount": [1, 8, 2147483647], "midiRootNote": range(48, 60), "keyType": [1, 2, 3, 4],
+              "signatureTop": [3, 12], "signatureBottom": [4, 8], "loopFileType": [1, 2], "instrumentType": TEXTS,
+              "instrumentSubType": TEXTS, "genre": TEXTS, "title": TEXTS, "artist": TEXTS, "copyright": TEXTS, "comments": TEXTS,
+              "descriptors": [["Dry"], ["$'", "Dry"]], "transients": ["0", "1,20,99", "7:3"]}
+
+    def quoted(self, text):
+        """The notation of shells, as their user would type it."""
+        return "$'" + "".join(f"\\x{byte:02x}" if byte < 128 else chr(byte) for byte in text.encode()).encode("latin-1").decode() + "'"
+
+    def setUp(self):
+        super().setUp()
+        self.run_command("tags", "remove", *SAMPLES)
+        self.clean = {name[-4:]: (self.folder / name).read_bytes() for name in SAMPLES}
+
+    def fresh(self, *names):
+        for name in names:
+            self.write(name, self.clean[name[-4:]])
+
+    def assert_goes_back(self, name):
+        """By lines in one go, by `read -r` in a shell line by line, and by JSON."""
+        copies = [f"{road}{name}" for road in ("lines-", "shell-", "json-")]
+        self.fresh(*copies)
+        lines = [line.split("\t", 1) for line in self.run_command("tags", name).stdout.decode().split("\n")[:-1]]
+        self.set(copies[0], *("=".join(line) for line in lines if line[0] != "tempo"))
+        script = """a=(); while IFS=$'\\t' read -r k v; do [ $k = tempo ] || a+=("$k=$v"); done < <("$0" tags "$1"); "$0" tags set "$2" "${a[@]}\""""
+        subprocess.run(["bash", "-c", script, KTFILES, name, copies[1]], cwd=self.folder, check=True, capture_output=True)
+        shown = self.tags(name)
+        self.set(copies[2], *(f"{key}={self.json_text(value)}" for key, value in shown.items() if key not in (*SOUND, "tempo")))
+        for copy in self.tags(*copies):
+            self.assertEqual({**copy, "path": name}, shown)
+
+    def json_text(self, value):
+        if isinstance(value, list):
+            return ",".join(f"{each['frame']}:{each['type']}" if isinstance(each, dict) else self.quoted(each) for each in value)
+        return self.quoted(value) if isinstance(value, str) and value[:2] == "$'" or str(value) != str(value).strip() else value
+
+    def test_every_field_and_value(self):
+        random = Random(1)
+        for turn in range(len(self.TEXTS)):
+            self.fresh("t.aiff", "t.caf")
+            for name in ("t.aiff", "t.caf"):
+                arguments = []
+                for index, (field, values) in enumerate(self.FIELDS.items()):
+                    value = values[(turn + 5 * index) % len(values)]
+                    if turn > 3 and random.random() < 0.4 or name == "t.caf" and field in ("loopFileType", "signatureBottom"):
+                        continue
+                    if name == "t.caf" and field in ("genre", "instrumentType", "instrumentSubType", "descriptors"):
+                        value = "Rock"  # what CAF takes for one of its terms
+                    if name == "t.caf" and field == "signatureTop":
+                        field, value = "signature", "6/8"
+                    if name == "t.aiff" and field == "comments":
+                        value = value.strip()
+                    value = ",".join(map(self.quoted, value)) if isinstance(value, list) else value
+                    arguments.append(f"{field}={self.quoted(value) if value in self.TEXTS else value}")
+                self.set(name, *arguments)
+                self.assert_goes_back(name)
+
+    def test_lists_and_texts_of_others(self):
+        aiff_with(self.folder / "a.aiff", (b"basc", BASIC), (b"cate", category(b" Bass ", descriptors=(b"a, b", b" c", b"d'"))),
+                  (b"trns", bytes(72) + struct.pack(">I", 2) + struct.pack(">HHI16xHHI16x", 1, 0, 77, 5, 0, 80)))
+        self.assertIn("transients\t77,80:5", self.lines("tags", "a.aiff"))
+        self.assertIn("descriptors\t$' c', $'a, b', d'", self.lines("tags", "a.aiff"))
+        self.assert_goes_back("a.aiff")
+
+    def test_words_and_numbers(self):
+        for arguments, expected in ((["key=B minor"], {"midiRootNote": 59, "keyType": 1}), (["key=Bbm"], {"midiRootNote": 58, "keyType": 1}),
+                                    (["Key=54 major"], {"midiRootNote": 54, "keyType": 2}), (["key=minor"], {"keyType": 1}),
+                                    (["key=Gb", "midiRootNote=54", "mode=Minor", "keyType=1"], {"midiRootNote": 54, "keyType": 1}),
+                                    (["key=major and minor"], {"keyType": 4}), (["root-note=C"], {"midiRootNote": 48}),
+                                    (["beats=8", "Kind=not a loop"], {"beatCount": 8, "loopFileType": 2}),
+                                    (["category=Bass", "Sub-category=Electric"], {"instrumentType": "Bass", "instrumentSubType": "Electric"})):
+            self.fresh("a.aiff")
+            self.set("a.aiff", *arguments)
+            self.assertEqual(Edits.without(None, self.tags("a.aiff")), expected, arguments)
+        self.set("a.aiff", "key=A minor", "genre=Rock")
+        self.run_command("tags", "remove", "a.aiff", "key", "category", "sub category")
+        self.assertEqual(Edits.without(None, self.tags("a.aiff")), {"genre": "Rock"})
+        for arguments, said in ((["ctegory=x"], 'did you mean "category"?'), (["tempo=120"], "set beats=N"), (["BPM=1"], "set beats=N"),
+                                (["key=A 7"], "a note such as"), (["title=$'x"], "goes on to the next '"), (["title=$'\\q'"], 'no "\\q"'),
+                                (["title=$'x' y"], '" y" follows'), (["key=A minor", "mode=major"], "to different values"),
+                                (["title=$'\\xff'"], "not valid UTF-8"), (["chunks=CHST (5 bytes)"], "tags copy")):
+            self.assertIn(said, self.failure("tags", "set", "a.aiff", *arguments, status=2))
 
 
 BASIC_UUID = bytes.fromhex("29819273b5bf4aefb78d62d1ef90bb2c")

@@ -70,10 +70,13 @@ public:
                                         [](const ScanRecord& record) { return record.kind == ScanRecord::loop; });
         if (sharesTerminal && prints)
             progress_.hide();
+        files_ += std::ssize(records);
         for (ScanRecord& record : records)
             if (record.kind != ScanRecord::none) {
                 writer_.add(record);
-                if (record.kind == ScanRecord::bad)
+                if (record.kind == ScanRecord::loop)
+                    ++loops_;
+                else
                     bad_.push_back({std::move(record.path), std::move(record.text)});
             }
         if (sharesTerminal && prints)
@@ -84,10 +87,20 @@ public:
         return true;
     }
     const std::vector<BadFile>& bad() const { return bad_; }
+    /// "3 loops among 1024 files", for people.
+    std::string count() const
+    {
+        const auto counted = [](std::int64_t number, const char* what) {
+            return fmt::format("{} {}{}", number == 0 ? "no" : std::to_string(number), what, number == 1 ? "" : "s");
+        };
+        return counted(loops_, "loop") + " among " + counted(files_, "file");
+    }
 
 private:
     ScanWriter& writer_;
     FilesProgress& progress_;
+    std::int64_t files_ = 0;
+    std::int64_t loops_ = 0;
     std::vector<BadFile> bad_;
 };
 
@@ -144,6 +157,9 @@ bool runScan(const ScanArguments& arguments, const OutputOptions& options)
     Output::standard().flush(); // ahead of what follows on standard error
     for (const BadFile& file : results.bad())
         reportFailure(file.path, file.problem);
+    // For who watches: records go to standard output alone, and scripts that keep both find problems only.
+    if (!options.quiet && isTerminal(STDERR_FILENO) && !Output::standard().failed())
+        fmt::print(stderr, "{}\n", results.count());
     return results.bad().empty();
 }
 

@@ -83,12 +83,12 @@ std::string csvLine(const std::string& path, const LoopTags& tags)
     return line + "\r\n";
 }
 
-// The tags of `names`, made fit for one line of text.
+// The tags of `names`, each in one line.
 std::vector<std::string> cells(const LoopTags& tags, std::initializer_list<const char*> names)
 {
     std::vector<std::string> row;
     for (const char* name : names)
-        row.push_back(printable(tagText(tags, name)));
+        row.push_back(tagText(tags, name));
     return row;
 }
 

@@ -32,7 +32,7 @@ public:
         } else if (form_ == Form::lines) {
             for (const TagLine& line : tagLines(tags))
                 output_.print("{}{}{}\t{}\n", several_ ? printable(path) : "", several_ ? "\t" : "", line.name,
-                              printable(line.text));
+                              line.text);
         }
         first_ = false;
     }
@@ -49,7 +49,7 @@ private:
                       color_ ? "\x1b[0m" : "", loopContainerName(tags.fileType));
         const auto lines = tagLines(tags);
         for (const TagLine& line : lines)
-            output_.print("  {:<{}}  {}{}\n", line.label, kLabelWidth, printable(line.text),
+            output_.print("  {:<{}}  {}{}\n", line.label, kLabelWidth, line.brief,
                           line.name == std::string_view("tempo") ? " BPM" : "");
         if (lines.empty())
             output_.print("  no loop tags\n");

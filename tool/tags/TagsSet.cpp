@@ -1,7 +1,7 @@
 // ktfiles tags set, and remove: the same edit, with values and without.
 #include "media/containers/ContainerHeaders.h"
 #include "tool/shared/arguments/CommandLine.h"
-#include "tool/shared/looptags/LoopTagFields.h"
+#include "tool/shared/looptags/LoopTagArguments.h"
 #include "tool/shared/looptags/LoopTagsEdit.h"
 #include "tool/shared/looptags/LoopTagsPatch.h"
 #include "tool/shared/output/Failure.h"
@@ -14,8 +14,6 @@ using platform::Dictionary;
 using platform::Value;
 
 namespace {
-
-constexpr std::int32_t kTransientType = 1; // the one whose meaning is known
 
 bool isAssigned(const std::vector<TagAssignment>& assignments, const TagField& field)
 {
@@ -47,7 +45,7 @@ std::string containerPhrase(FourCC fileType)
     return fileType == kAIFF ? "an AIFF file" : "a CAF file";
 }
 
-// Transients that were there keep their type.
+// Transients that were there keep their type, unless another one is named.
 std::vector<VireoLoopTransient> transientsAt(const Value& frames, const LoopTags& before)
 {
     std::vector<VireoLoopTransient> transients;
@@ -57,10 +55,15 @@ std::vector<VireoLoopTransient> transientsAt(const Value& frames, const LoopTags
     std::map<std::uint64_t, std::int32_t> types;
     for (const VireoLoopTransient& transient : before.transients)
         types.emplace(transient.frame(), transient.transientType());
+    constexpr std::int32_t usual = 1; // the one whose meaning is known
     for (const Value& each : *list) {
-        const auto frame = static_cast<std::uint64_t>(*each.get<std::int64_t>());
+        const auto* const typed = each.get<platform::Array>();
+        const auto frame = static_cast<std::uint64_t>(*(typed != nullptr ? typed->front() : each).get<std::int64_t>());
         const auto old = types.find(frame);
-        transients.emplace_back(old == types.end() ? kTransientType : old->second, frame);
+        transients.emplace_back(typed != nullptr     ? static_cast<std::int32_t>(*typed->back().get<std::int64_t>())
+                                : old == types.end() ? usual
+                                                     : old->second,
+                                frame);
     }
     return transients;
 }

@@ -1,7 +1,5 @@
-// The vocabulary of loop tags on the command line: the keys, the names of notes and modes, and KEY=VALUE.
+// The vocabulary of loop tags: their names, and those of notes and modes.
 #pragma once
-
-#include "platform/core/Value.h"
 
 #include <cstdint>
 #include <span>
@@ -15,7 +13,8 @@ class VireoLoopBaseChunk;
 struct TagField {
     enum class Kind { number, text, list, transients };
 
-    const char* name; // in JSON and on the command line
+    const char* name; // in JSON, in lines and on the command line
+    const char* word; // a shorter name for the command line, or the same
     const char* key;  // in the library's dictionary; null for the transients
     Kind kind;
     bool isFileInfo = false; // of the two dictionaries
@@ -26,24 +25,10 @@ struct TagField {
 /// All of them, in the order of output.
 std::span<const TagField> tagFields();
 
-/// The fields that a key of the command line stands for: one, two for "signature", none for an unknown key.
+/// The fields that a name of the command line stands for: one, two for "signature" and for "key", which is a root note
+/// with its mode, none for an unknown one. Case does not count, nor do "-", "_" and spaces: labels of a table are
+/// names.
 std::vector<const TagField*> fieldsForKey(std::string_view key);
-
-/// A field and its new value: null to clear it, an array of integers for transients.
-struct TagAssignment {
-    const TagField* field;
-    platform::Value value;
-};
-
-/// Files and "KEY=VALUE" in any order, told apart: what has a "=" and no "/" ahead of it is an assignment. Throws
-/// UsageError for an unknown key, a key named twice and a value that can never be.
-struct TagArguments {
-    std::vector<std::string> files;
-    std::vector<TagAssignment> assignments;
-};
-TagArguments parseAssignments(std::span<const std::string> arguments);
-/// The same for "tags remove": what is a key and holds no "/" is one; its field is to be cleared.
-TagArguments parseKeys(std::span<const std::string> arguments);
 
 /// "C" to "B" for MIDI notes 48 to 59, the number for others.
 std::string noteName(std::int64_t note);

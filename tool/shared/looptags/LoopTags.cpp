@@ -4,6 +4,7 @@
 #include "loops/VireoLoopTerms.h"
 #include "loops/VireoLoopUserDataUtils.h"
 #include "media/containers/ContainerHeaders.h"
+#include "tool/shared/arguments/QuotedText.h"
 #include "tool/shared/input/InputFile.h"
 #include "tool/shared/looptags/LoopTagFields.h"
 #include "tool/shared/output/JsonWriter.h"
@@ -92,12 +93,19 @@ std::string signatureText(const LoopTags& tags)
 {
     const std::int64_t top = tags.number(VireoLoopCombinedTagsChunkDataSignatureTopKey);
     const std::int64_t bottom = tags.number(VireoLoopCombinedTagsChunkDataSignatureBottomKey);
-    return top == 0 && bottom == 0 ? "" : fmt::format("{}/{}", top, bottom);
+    return top == 0 || bottom == 0 ? "" : fmt::format("{}/{}", top, bottom);
 }
 
 std::string numberText(std::int64_t number)
 {
     return number == 0 ? "" : std::to_string(number);
+}
+
+// One part of a signature without the other.
+template <const char* const& part>
+std::string aloneText(const LoopTags& tags)
+{
+    return signatureText(tags).empty() ? numberText(tags.number(part)) : "";
 }
 
 std::string descriptorsText(const LoopTags& tags)
@@ -106,7 +114,7 @@ std::string descriptorsText(const LoopTags& tags)
     if (const auto* list = platform::find<platform::Array>(tags.combined, VireoLoopCombinedTagsChunkDataDescriptorsKey))
         for (const platform::Value& value : *list)
             if (const auto* text = value.get<std::string>())
-                joined += (joined.empty() ? "" : ", ") + *text;
+                joined += (joined.empty() ? "" : ", ") + quotedText(*text, ",");
     return joined;
 }
 
@@ -130,10 +138,22 @@ std::string kindText(const LoopTags& tags)
     return type == 1 ? "loop" : type == 2 ? "not a loop" : numberText(type);
 }
 
+// Frames, each with its type unless that is the usual one.
+std::string transientsText(const LoopTags& tags)
+{
+    std::string text;
+    for (const VireoLoopTransient& transient : tags.transients) {
+        text += fmt::format("{}{}", text.empty() ? "" : ",", transient.frame());
+        if (transient.transientType() != 1)
+            text += fmt::format(":{}", transient.transientType());
+    }
+    return text;
+}
+
 template <const char* const& key>
 std::string text(const LoopTags& tags)
 {
-    return tags.text(key);
+    return quotedText(tags.text(key));
 }
 
 // What is shown of a loop, in order.
@@ -141,6 +161,7 @@ struct ShownTag {
     const char* name;
     const char* label;
     std::string (*text)(const LoopTags& tags);
+    std::string (*brief)(const LoopTags& tags) = nullptr; // null: the same
 };
 const ShownTag kShownTags[] = {
     {"tempo", "Tempo", tempoText},
@@ -148,6 +169,8 @@ const ShownTag kShownTags[] = {
      [](const LoopTags& tags) { return numberText(tags.number(VireoLoopCombinedTagsChunkDataBeatCountKey)); }},
     {"key", "Key", keyText},
     {"signature", "Signature", signatureText},
+    {"signatureTop", "signatureTop", aloneText<VireoLoopCombinedTagsChunkDataSignatureTopKey>},
+    {"signatureBottom", "signatureBottom", aloneText<VireoLoopCombinedTagsChunkDataSignatureBottomKey>},
     {"loopFileType", "Kind", kindText},
     {"instrumentType", "Category", text<VireoLoopCombinedTagsChunkDataInstrumentTypeKey>},
     {"instrumentSubType", "Sub-category", text<VireoLoopCombinedTagsChunkDataInstrumentSubTypeKey>},
@@ -157,7 +180,8 @@ const ShownTag kShownTags[] = {
     {"artist", "Artist", text<VireoLoopFileInfoChunkDataArtistKey>},
     {"copyright", "Copyright", text<VireoLoopFileInfoChunkDataCopyrightKey>},
     {"comments", "Comments", text<VireoLoopFileInfoChunkDataCommentsKey>},
-    {"transients", "Transients", [](const LoopTags& tags) { return numberText(std::ssize(tags.transients)); }},
+    {"transients", "Transients", transientsText,
+     [](const LoopTags& tags) { return numberText(std::ssize(tags.transients)); }},
     {"chunks", "Chunks", chunksText},
 };
 
@@ -253,7 +277,7 @@ std::vector<TagLine> tagLines(const LoopTags& tags)
     std::vector<TagLine> lines;
     for (const ShownTag& shown : kShownTags)
         if (std::string text = shown.text(tags); !text.empty())
-            lines.push_back({shown.name, shown.label, std::move(text)});
+            lines.push_back({shown.name, shown.label, text, shown.brief != nullptr ? shown.brief(tags) : text});
     return lines;
 }
 
@@ -303,7 +327,7 @@ std::vector<TagValue> tagRecord(const LoopTags& tags)
         const auto* const number = tag.value.get<std::int64_t>();
         const std::string_view note = tag.name == "midiRootNote" && number ? VireoLoopNoteName(*number) : "";
         const std::string_view mode = tag.name == "keyType" && number ? VireoLoopModeName(*number) : "";
-        const bool endsSignature = tag.name == "signatureBottom";
+        const bool endsSignature = tag.name == "signatureBottom" && !signatureText(tags).empty();
         record.push_back(std::move(tag));
         if (!note.empty())
             record.push_back({"key", std::string(note)});

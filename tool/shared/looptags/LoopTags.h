@@ -46,15 +46,16 @@ LoopTags readLoopTags(const std::string& path);
 /// The chunks of an open file that hold loop tags or are carried, whether they can be read or not.
 std::vector<LoopTags::Chunk> loopChunksOf(VireoLoopChunksManager& manager);
 
-/// One tag in words: its name on the command line, its label for people, and the value.
+/// One tag in words: its name, its label for people, and the value.
 struct TagLine {
     const char* name;
     const char* label;
-    std::string text;
+    std::string text;  // in one line, as `tags set` takes it back
+    std::string brief; // for people
 };
-/// What is known of the tags, in a musician's order; texts are as in the file.
+/// What is known of the tags, in a musician's order.
 std::vector<TagLine> tagLines(const LoopTags& tags);
-/// The text of one tag by its name, which must be one of theirs.
+/// The text of one tag by its name, which must be one of theirs, in one line.
 std::string tagText(const LoopTags& tags, const char* name);
 
 /// "AIFF" or "CAF".

@@ -2,7 +2,7 @@
 #pragma once
 
 #include "loops/VireoLoopTransientChunkData.h"
-#include "tool/shared/looptags/LoopTagFields.h"
+#include "tool/shared/looptags/LoopTagArguments.h"
 #include "tool/shared/looptags/RawLoopTags.h"
 
 #include <optional>

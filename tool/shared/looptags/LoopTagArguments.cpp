@@ -1,0 +1,304 @@
+#include "tool/shared/looptags/LoopTagArguments.h"
+
+#include "loops/VireoLoopTerms.h"
+#include "platform/String.h"
+#include "platform/core/ASCIICase.h"
+#include "tool/shared/arguments/Nearest.h"
+#include "tool/shared/arguments/QuotedText.h"
+#include "tool/shared/arguments/UsageError.h"
+#include "tool/shared/output/Terminal.h"
+
+#include <fmt/format.h>
+
+#include <algorithm>
+#include <charconv>
+#include <map>
+#include <optional>
+#include <set>
+#include <sys/stat.h>
+
+using Kind = TagField::Kind;
+using platform::Value;
+
+namespace {
+
+[[noreturn]] void refuse(const std::string& message)
+{
+    throw UsageError(message);
+}
+
+[[noreturn]] void refuseValue(std::string_view key, std::string_view value, const std::string& expected)
+{
+    refuse(fmt::format("{}={}: {} expected", key, printable(value), expected));
+}
+
+std::string_view trimmed(std::string_view text)
+{
+    constexpr const char* kWhite = " \t\r\n\v\f";
+    const std::size_t start = std::min(text.find_first_not_of(kWhite), text.size());
+    return text.substr(start, text.find_last_not_of(kWhite) + 1 - start);
+}
+
+// A text between white space, or what a quoted one stands for.
+std::string meantText(std::string_view text)
+{
+    text = trimmed(text);
+    if (!isQuoted(text))
+        return std::string(text);
+    std::string meant = takeQuotedText(text);
+    if (!text.empty())
+        refuse(fmt::format("\"{}\" follows a value in $'…'", printable(text)));
+    return meant;
+}
+
+// The members of a list, between commas; those that are quoted may hold some.
+std::set<std::string> members(std::string_view text)
+{
+    std::set<std::string> each;
+    while (!text.empty()) {
+        std::string_view rest = trimmed(text);
+        if (isQuoted(rest))
+            takeQuotedText(rest);
+        const std::size_t end =
+            std::min(text.find(',', static_cast<std::size_t>(rest.data() - text.data())), text.size());
+        if (std::string member = meantText(text.substr(0, end)); !member.empty())
+            each.insert(std::move(member));
+        text.remove_prefix(std::min(end + 1, text.size()));
+    }
+    return each;
+}
+
+std::optional<std::int64_t> integer(std::string_view text)
+{
+    std::int64_t number = 0;
+    const auto result = std::from_chars(text.data(), text.data() + text.size(), number);
+    return result.ec == std::errc() && result.ptr == text.data() + text.size() ? std::optional(number) : std::nullopt;
+}
+
+// The words that stand for a field's numbers: notes, any of the names for the same key ("F#" and "Gb"), modes, kinds.
+std::optional<std::int64_t> numberOfWord(const TagField& field, std::string_view text)
+{
+    const std::string_view name = field.name;
+    if (name == "midiRootNote")
+        return VireoLoopNoteNamed(text);
+    if (name == "keyType") {
+        constexpr std::pair<std::string_view, std::int64_t> others[] = {
+            {"m", 1}, {"min", 1}, {"maj", 2}, {"neither major nor minor", 3}, {"major and minor", 4}};
+        for (const auto& [word, mode] : others)
+            if (word == text)
+                return mode;
+        std::string word(text);
+        std::ranges::transform(word, word.begin(), asciiLower);
+        return VireoLoopModeNamed(word);
+    }
+    if (name == "loopFileType")
+        return equalIgnoringASCIICase(text, "loop")         ? std::optional<std::int64_t>(1)
+               : equalIgnoringASCIICase(text, "not a loop") ? std::optional<std::int64_t>(2)
+                                                            : std::nullopt;
+    return std::nullopt;
+}
+
+std::optional<std::int64_t> numberOf(const TagField& field, std::string_view text)
+{
+    const auto number = integer(text);
+    return number ? number : numberOfWord(field, text);
+}
+
+std::string expectedOf(const TagField& field)
+{
+    const std::string_view name = field.name;
+    const std::string words = name == "midiRootNote"   ? "a note such as C, F# or Bb, or "
+                              : name == "keyType"      ? "none, minor, major, neither or both, or "
+                              : name == "loopFileType" ? "loop or \"not a loop\", or "
+                                                       : "";
+    return fmt::format("{}a whole number from {} to {}", words, field.least, field.most);
+}
+
+Value numberValue(const TagField& field, std::string_view key, std::string_view text)
+{
+    const auto number = numberOf(field, trimmed(text));
+    if (!number || *number < field.least || *number > field.most)
+        refuseValue(key, text, expectedOf(field));
+    return *number;
+}
+
+Value transientsValue(std::string_view text)
+{
+    std::map<std::int64_t, std::int64_t> types;
+    for (const std::string& member : members(text)) {
+        const std::string_view part = member;
+        const std::size_t colon = std::min(part.find(':'), part.size());
+        const auto frame = integer(part.substr(0, colon));
+        const auto type = colon < part.size() ? integer(part.substr(colon + 1)) : 1;
+        if (!frame || *frame < 0 || !type || *type < INT16_MIN || *type > UINT16_MAX)
+            refuseValue("transients", part, "sample frames such as 0,11025,22050, or FRAME:TYPE,");
+        types[*frame] = *type;
+    }
+    platform::Array transients;
+    for (const auto& [frame, type] : types)
+        transients.push_back(type == 1 ? Value(frame) : Value(platform::Array{Value(frame), Value(type)}));
+    return transients;
+}
+
+Value fieldValue(const TagField& field, std::string_view key, std::string_view text)
+{
+    if (trimmed(text).empty())
+        return {};
+    switch (field.kind) {
+    case Kind::number:
+        return numberValue(field, key, text);
+    case Kind::list: {
+        const std::set<std::string> each = members(text);
+        return platform::Array(each.begin(), each.end());
+    }
+    case Kind::transients:
+        return transientsValue(text);
+    case Kind::text:
+        break;
+    }
+    return meantText(text);
+}
+
+bool isWord(std::string_view key, std::string_view word)
+{
+    const auto fields = fieldsForKey(word);
+    return !fields.empty() && fieldsForKey(key) == fields;
+}
+
+std::string knownKeys()
+{
+    std::string keys;
+    for (const TagField& field : tagFields())
+        (keys += field.name) += ", ";
+    return keys + "key, mode, signature; and beats, category, subCategory, kind";
+}
+
+std::string suggestion(std::string_view key)
+{
+    std::vector<std::string_view> words{"key", "signature", "tempo"};
+    for (const TagField& field : tagFields())
+        words.insert(words.end(), {field.name, field.word});
+    return didYouMean(key, words);
+}
+
+// What `tags` shows and nobody can set.
+void refuseShown(std::string_view key, std::string_view text)
+{
+    if (equalIgnoringASCIICase(key, "tempo") || equalIgnoringASCIICase(key, "bpm"))
+        refuse(fmt::format("{}={}: the tempo follows from beats, length and sample rate; set beats=N instead, where N "
+                           "is the tempo times the seconds of the sound, by 60",
+                           key, printable(text)));
+    if (equalIgnoringASCIICase(key, "chunks"))
+        refuse("chunks cannot be set; tags copy carries them from one file to another");
+}
+
+// The parts of a key by the fields that they are for: a note, with a mode behind it or without, or a mode alone.
+std::vector<TagAssignment> keyParts(std::string_view text, const std::vector<const TagField*>& fields)
+{
+    const TagField& root = *fields[0];
+    const TagField& mode = *fields[1];
+    if (const auto alone = numberOfWord(mode, text); alone && text != "m")
+        return {{&mode, *alone}};
+    for (std::size_t end = text.size(); end > 0; --end) { // the longest that is a note: "Bb" is no "B"
+        const auto note = numberOf(root, text.substr(0, end));
+        const std::string_view behind = trimmed(text.substr(end));
+        const auto type = numberOf(mode, behind);
+        if (!note || *note < root.least || *note > root.most || (!behind.empty() && !type) ||
+            (type && (*type < mode.least || *type > mode.most)))
+            continue;
+        std::vector<TagAssignment> parts{{&root, *note}};
+        if (type)
+            parts.push_back({&mode, *type});
+        return parts;
+    }
+    refuseValue("key", text, "a note such as C, F# or Bb, with minor or major behind it or without,");
+}
+
+std::vector<TagAssignment> signatureParts(std::string_view text, const std::vector<const TagField*>& fields)
+{
+    const std::size_t slash = text.find('/');
+    if (slash == std::string_view::npos || slash == 0 || slash + 1 == text.size() ||
+        text.find('/', slash + 1) != std::string_view::npos)
+        refuseValue("signature", text, "a signature such as 4/4");
+    return {{fields[0], numberValue(*fields[0], "signature", text.substr(0, slash))},
+            {fields[1], numberValue(*fields[1], "signature", text.substr(slash + 1))}};
+}
+
+std::vector<TagAssignment> assignmentsOf(std::string_view key, std::string_view text)
+{
+    const auto fields = fieldsForKey(key);
+    if (fields.empty())
+        refuseShown(key, text);
+    if (fields.empty())
+        refuse(fmt::format("there is no tag \"{}\" (a file of that name is \"./{}={}\"){}; tags are {}", printable(key),
+                           printable(key), printable(text), suggestion(key), knownKeys()));
+    std::vector<TagAssignment> parts;
+    if (!trimmed(text).empty() && isWord(key, "key")) {
+        parts = keyParts(trimmed(text), fields);
+    } else if (!trimmed(text).empty() && isWord(key, "signature")) {
+        parts = signatureParts(trimmed(text), fields);
+    } else {
+        for (const TagField* field : fields)
+            parts.push_back({field, fieldValue(*field, key, text)});
+    }
+    return parts;
+}
+
+bool isUTF8(const Value& value)
+{
+    const auto* text = value.get<std::string>();
+    const auto* list = value.get<platform::Array>();
+    return (text == nullptr || platform::String::fromUTF8(*text)) &&
+           (list == nullptr || std::ranges::all_of(*list, isUTF8));
+}
+
+// JSON has a key in words and in numbers, which may both be given.
+void assign(std::vector<TagAssignment>& assignments, std::string_view key, std::string_view text)
+{
+    for (TagAssignment& part : assignmentsOf(key, text)) {
+        if (!isUTF8(part.value))
+            refuse(fmt::format("the value of {} is not valid UTF-8", key));
+        const auto earlier = std::ranges::find(assignments, part.field, &TagAssignment::field);
+        if (earlier == assignments.end())
+            assignments.push_back(std::move(part));
+        else if (earlier->value != part.value)
+            refuse(fmt::format("{} is set twice, to different values", part.field->name));
+    }
+}
+
+} // namespace
+
+TagArguments parseAssignments(std::span<const std::string> arguments)
+{
+    TagArguments parsed;
+    for (const std::string& argument : arguments) {
+        const std::size_t equals = argument.find('=');
+        if (equals == std::string::npos || argument.find('/') < equals)
+            parsed.files.push_back(argument);
+        else
+            assign(parsed.assignments, std::string_view(argument).substr(0, equals),
+                   std::string_view(argument).substr(equals + 1));
+    }
+    if (parsed.assignments.empty())
+        refuse("KEY=VALUE is missing; keys are " + knownKeys());
+    return parsed;
+}
+
+TagArguments parseKeys(std::span<const std::string> arguments)
+{
+    TagArguments parsed;
+    for (const std::string& argument : arguments) {
+        const auto fields = fieldsForKey(argument);
+        struct stat status = {};
+        // A misspelt key must not pass for a missing file: without keys all tags of the other files would go.
+        if (fields.empty() && argument.find('/') == std::string::npos && ::lstat(argument.c_str(), &status) != 0)
+            refuse(fmt::format("\"{}\" is neither a file nor a tag{}; tags are {}", printable(argument),
+                               suggestion(argument), knownKeys()));
+        if (fields.empty())
+            parsed.files.push_back(argument);
+        for (const TagField* field : fields)
+            if (std::ranges::find(parsed.assignments, field, &TagAssignment::field) == parsed.assignments.end())
+                parsed.assignments.push_back({field, {}});
+    }
+    return parsed;
+}

@@ -1,6 +1,7 @@
 """ktfiles info --check, --md5 and --sha256: what is off in files, and digests of their sound."""
 import hashlib
 import json
+import struct
 import subprocess
 import unittest
 
@@ -77,6 +78,44 @@ class Check(CommandTest):
         self.assertGreater(len(cut), 50)
         for path in cut:
             self.assertTrue(check[path].get("findings"), path)
+
+    def test_embedded_digest(self):
+        # Of the two orders the first is the published one: a number of 128 bits, little-endian, as mediainfo reads it.
+        digest = hashlib.md5(wave()[44:]).digest()
+        for name, body, kinds in (("a.wav", digest[::-1], []), ("b.wav", digest, []), ("c.wav", bytes(16), ["digestDiffers"]),
+                                  ("d.wav", digest[:15], ["digestIsWrong"])):
+            self.write(name, wave(chunk(b"MD5 ", body)))
+            findings = self.json("info", "--check", name, status=1 if kinds else 0)[0]["findings"]
+            self.assertEqual([(one["kind"], one["offset"]) for one in findings], [(kind, 244) for kind in kinds], name)
+        shown = subprocess.run(["mediainfo", "--Details=1", self.folder / "a.wav"], capture_output=True, text=True).stdout
+        self.assertIn(f"(0x{digest.hex().upper()})", shown)
+        # Sound that changes; and sound that lacks some, of which no more is said.
+        self.write("e.wav", wave(chunk(b"MD5 ", digest[::-1])).replace(b"\x41\x42", b"\x41\x43", 1))
+        self.assertIn(' 244: "MD5 " states another MD5', self.lines("info", "--check", "e.wav", status=1)[0])
+
+    def test_tracks_against_channels_and_document(self):
+        def chna(*uids, track=1):
+            rows = b"".join(struct.pack("<H12s14s11sx", track + i, uid, b"AT_00010001_01", b"AP_00010001") for i, uid in enumerate(uids))
+            return chunk(b"chna", struct.pack("<HH", len(uids), len(uids)) + rows)
+
+        axml = chunk(b"axml", b'<ebuCoreMain><audioFormatExtended><audioTrackUID UID="ATU_00000001"/></audioFormatExtended></ebuCoreMain>')
+        one, two = b"ATU_00000001", b"ATU_00000002"
+        for name, chunks, texts in (
+                ("good.wav", [axml, chna(one)], []), ("common.wav", [chna(one)], []), ("text.wav", [chunk(b"axml", b"<a/>")], []),
+                ("channel.wav", [chna(one, track=2)], ["in track 2, and the file 1 channel"]),
+                ("undefined.wav", [chna(two), axml], ["'ATU_00000001' is not in", "'ATU_00000002' of the chunk"]),
+                ("counts.wav", [chna(one)[:-40] + bytes(40)], ["counts 1 track, and uses 0"]),
+                ("more.wav", [chunk(b"chna", chna(one, two)[8:10] + b"\1\0" + chna(one, two)[12:])],
+                 ["'ATU_00000002' in track 2", "counts 1 UID, and 1 behind"][1:]),
+                ("none.wav", [axml], ["no chunk \"chna\" tells"]), ("broken.wav", [chunk(b"axml", b"<a>\n<b>")], ["beyond its line 2"])):
+            self.write(name, wave(*chunks))
+            found = self.lines("info", "--check", name, status=1 if texts else 0)
+            self.assertEqual(len(found), len(texts), found)
+            for line, text in zip(found, texts):
+                self.assertIn(text, line)
+                self.assertRegex(line, f"^{name}: 244: \"(chna|axml)\" ")
+        self.assertEqual([one["kind"] for name in ("none.wav", "broken.wav") for one in
+                          self.json("info", "--check", name, status=1)[0]["findings"]], ["tracksDiffer", "documentIsBroken"])
 
     @needs_decoders
     def test_compressed_files_that_lack_some(self):

@@ -3,7 +3,7 @@
 #pragma once
 
 #include "adm/ADMDocument.h"
-#include "tool/adm/AdmSource.h"
+#include "tool/shared/adm/AdmSource.h"
 
 #include <vector>
 

@@ -1,9 +1,10 @@
 // ktfiles adm: what an ADM document describes, as a tree or as JSON, and what is wrong with it.
 #include "tool/adm/AdmCheck.h"
 #include "tool/adm/AdmJson.h"
-#include "tool/adm/AdmSource.h"
 #include "tool/adm/AdmTree.h"
 #include "tool/shared/access/FileAccess.h"
+#include "tool/shared/adm/AdmSource.h"
+#include "tool/shared/adm/AdmText.h"
 #include "tool/shared/arguments/CommandLine.h"
 #include "tool/shared/arguments/ThreadsOption.h"
 #include "tool/shared/input/FileByFile.h"

@@ -1,5 +1,7 @@
 #include "tool/adm/AdmTree.h"
 
+#include "tool/shared/adm/AdmText.h"
+
 #include <type_traits>
 
 namespace {

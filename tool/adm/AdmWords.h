@@ -29,10 +29,3 @@ AdmNode describe(const ADMAudioBlockFormat& block);
 
 /// The library keeps it unsigned, so that one below zero is a very large number there.
 std::int64_t signedImportance(const ADMAudioPackFormat& pack);
-
-/// The start of a very long text, for one that is told again and again: of names of 16 KB a small document could make
-/// gigabytes.
-std::string shortened(const std::string& text);
-
-/// "1 object", "4,000 objects".
-std::string countText(std::size_t count, std::string_view noun);

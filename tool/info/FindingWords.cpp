@@ -32,8 +32,13 @@ FindingWords wordsOf(const platform::ContainerFinding& finding)
         return {"chunkBehind", fmt::format("stands behind the end of the container, {}", stated),
                 "most readers do not find it"};
     case Kind::chunkReachesOut:
-        return {"chunkReachesOut", fmt::format("ends at {}, the container at {}", found, stated),
+        return {"chunkReachesOut", fmt::format("ends at {}, what it stands in at {}", found, stated),
                 "some readers cut it there"};
+    case Kind::chunkIsShort:
+        return {"chunkIsShort", fmt::format("has {}, at least {} belong to it", bytesText(found), stated),
+                "readers pass over it, or refuse the file"};
+    case Kind::idIsNoName:
+        return {"idIsNoName", "has no name of four printable characters", "some readers stop here"};
     case Kind::chunkIsCut:
         return {"chunkIsCut", fmt::format("says {}, {} are there", bytesText(stated), found),
                 "readers take what is there, or refuse the file"};
@@ -73,6 +78,20 @@ FindingWords wordsOf(const platform::ContainerFinding& finding)
     case Kind::sizes64Differ:
         return {"sizes64Differ", fmt::format("says {}, the \"ds64\" {}", bytesText(stated), found),
                 "lengths differ from reader to reader"};
+    case Kind::byteRateDiffers:
+        return {"byteRateDiffers", fmt::format("says {} a second, there are {}", bytesText(stated), found),
+                "some players show another length"};
+    case Kind::factIsMissing:
+        return {"factIsMissing", "is missing", "readers estimate the length, or decode to learn it"};
+    case Kind::tableIsShort:
+        return {"tableIsShort", fmt::format("counts {} further sizes, and has room for {}", stated, found),
+                "readers pass over them, or refuse the file"};
+    case Kind::digestIsWrong:
+        return {"digestIsWrong", fmt::format("has {}, and an MD5 16", bytesText(found)),
+                "nobody can compare the sound"};
+    case Kind::digestDiffers:
+        return {"digestDiffers", "states another MD5 than that of the sound",
+                "the sound has changed since, or was damaged"};
     }
     return {"", "", ""};
 }

@@ -1,6 +1,7 @@
 #include "tool/info/InfoCheck.h"
 
 #include "audiofile/AudioFileCheck.h"
+#include "tool/info/AdmFindings.h"
 #include "tool/info/FileDescription.h"
 #include "tool/info/FindingWords.h"
 #include "tool/shared/access/FileAccess.h"
@@ -8,14 +9,14 @@
 #include "tool/shared/input/InputFile.h"
 #include "tool/shared/output/JsonRecords.h"
 
-#include <optional>
-
 namespace {
 
 /// One thing that is off.
 struct Problem {
-    FindingWords words;
-    std::optional<platform::ContainerFinding> place; // none of files without chunks
+    const char* name; // in JSON
+    std::string text, effect;
+    FourCC chunk = 0; // 0 in files without chunks
+    std::uint64_t offset = 0;
 };
 
 /// Of what is compressed throughout only the length can be told.
@@ -27,27 +28,54 @@ std::vector<Problem> problemsOfSound(const std::string& path, bool quiet)
     const std::int64_t promised = promisedFrames(info);
     const std::string text = promised > 0 ? fmt::format("promises {} frames, {} are there", promised, info.frames)
                                           : fmt::format("lacks {} bytes of sound", info.missingDataSize);
-    return {{{"soundIsCut", text, "readers take what is there"}, std::nullopt}};
+    return {{"soundIsCut", text, "readers take what is there"}};
+}
+
+/// Those that are cut are told by their sizes.
+AdmChunks wholeAdmChunks(CAudioFileIO& file)
+{
+    AdmChunks chunks;
+    ContainerExtent extent;
+    const auto visit = [&](const ChunkEntry& chunk) {
+        const bool isWhole = chunk.size >= 0 && chunk.size <= extent.fileLength - chunk.body;
+        if (isWhole && chunk.id == fourCC("axml"))
+            chunks.document = chunk;
+        else if (isWhole && chunk.id == fourCC("chna"))
+            chunks.tracks = chunk;
+        return true;
+    };
+    requireOK(file.ForEachChunk(visit, &extent));
+    return chunks;
 }
 
 /// Throws Failure.
 std::vector<Problem> problemsOf(const std::string& path, bool quiet)
 {
     std::vector<platform::ContainerFinding> findings;
-    std::int32_t status = 0;
+    std::vector<Problem> problems;
     {
         const FileAccess access = accessForReading(path, {.quiet = quiet});
-        CFileIO file;
-        requireOK(file.OpenRead(referenceTo(path), 0));
-        status = CheckAudioFile(file, findings);
+        CAudioFileIO file;
+        requireOK(file.OpenForChunks(referenceTo(path), 0));
+        std::int32_t status = CheckAudioFile(file, findings);
+        if (status == kStatusOK)
+            status = CheckStatedDigest(file, findings);
+        for (const platform::ContainerFinding& finding : findings) {
+            const FindingWords words = wordsOf(finding);
+            problems.push_back({words.name, words.text, words.effect, finding.chunk, finding.offset});
+        }
+        if (status == kStatusOK) {
+            const AdmChunks chunks = file.HasChunks() ? wholeAdmChunks(file) : AdmChunks();
+            if (chunks.document || chunks.tracks)
+                for (const AdmFinding& finding : admFindings(path, chunks))
+                    problems.push_back({finding.name, finding.text, finding.effect, finding.chunk,
+                                        static_cast<std::uint64_t>(finding.offset)});
+            return problems;
+        }
+        if (status != kStatusParameterError && status != kStatusEndOfFile)
+            requireOK(status);
     }
-    if (status == kStatusParameterError || status == kStatusEndOfFile)
-        return problemsOfSound(path, quiet);
-    requireOK(status);
-    std::vector<Problem> problems;
-    for (const platform::ContainerFinding& finding : findings)
-        problems.push_back({wordsOf(finding), finding});
-    return problems;
+    return problemsOfSound(path, quiet);
 }
 
 class CheckWriter {
@@ -61,8 +89,7 @@ public:
             addRecord(path, problems);
         else if (form_ != Form::none)
             for (const Problem& problem : problems)
-                output_.print("{}: {}{}; {}\n", printable(path), placeText(problem), problem.words.text,
-                              problem.words.effect);
+                output_.print("{}: {}{}; {}\n", printable(path), placeText(problem), problem.text, problem.effect);
     }
     void addFailure(const std::string& path, const std::string& text) { json_.addFailure(path, text); }
     void finish() { json_.finish(); }
@@ -71,9 +98,9 @@ public:
 private:
     static std::string placeText(const Problem& problem)
     {
-        if (!problem.place)
+        if (problem.chunk == 0)
             return {};
-        return fmt::format("{}: \"{}\" ", problem.place->offset, printable(fourCCText(problem.place->chunk)));
+        return fmt::format("{}: \"{}\" ", problem.offset, printable(fourCCText(problem.chunk)));
     }
     void addRecord(const std::string& path, const std::vector<Problem>& problems)
     {
@@ -81,10 +108,10 @@ private:
         json.beginObject().member("path", path);
         json.key("findings").beginArray();
         for (const Problem& problem : problems) {
-            json.beginObject().member("kind", problem.words.name);
-            if (problem.place)
-                json.member("id", fourCCText(problem.place->chunk)).member("offset", problem.place->offset);
-            json.member("text", problem.words.text).member("effect", problem.words.effect).endObject();
+            json.beginObject().member("kind", problem.name);
+            if (problem.chunk != 0)
+                json.member("id", fourCCText(problem.chunk)).member("offset", problem.offset);
+            json.member("text", problem.text).member("effect", problem.effect).endObject();
         }
         json.endArray().endObject();
         json_.end();

@@ -1,12 +1,11 @@
 #include "media/containers/ContainerCheck.h"
 
 #include "media/containers/AudioDescription.h"
+#include "media/containers/ChunkRules.h"
 #include "media/containers/ChunkWalk.h"
 
 #include <algorithm>
-#include <array>
 #include <optional>
-#include <span>
 #include <unordered_map>
 #include <utility>
 
@@ -17,32 +16,6 @@ namespace {
 using Kind = ContainerFinding::Kind;
 
 constexpr std::uint32_t kOpenField = 0xFFFFFFFF;
-
-/// Chunks of which a file may have one.
-constexpr std::array kSingleInWAVE{fourCC("fmt "), fourCC("data"), fourCC("ds64"), fourCC("fact"), fourCC("bext"),
-                                   fourCC("axml"), fourCC("chna"), fourCC("iXML"), fourCC("cue "), fourCC("smpl"),
-                                   fourCC("inst"), fourCC("acid"), fourCC("levl")};
-constexpr std::array kSingleInAIFF{fourCC("COMM"), fourCC("SSND"), fourCC("FVER"), fourCC("MARK"), fourCC("INST"),
-                                   fourCC("COMT"), fourCC("NAME"), fourCC("AUTH"), fourCC("(c) "), fourCC("AESD")};
-constexpr std::array kSingleInCAF{fourCC("desc"), fourCC("data"), fourCC("pakt"), fourCC("kuki"),
-                                  fourCC("chan"), fourCC("strg"), fourCC("mark"), fourCC("regn"),
-                                  fourCC("inst"), fourCC("info"), fourCC("umid"), fourCC("midi")};
-
-std::span<const FourCC> singleChunksOf(ContainerKind kind)
-{
-    switch (kind) {
-    case ContainerKind::riff:
-    case ContainerKind::rifx:
-    case ContainerKind::wave64:
-        return kSingleInWAVE;
-    case ContainerKind::iff:
-        return kSingleInAIFF;
-    case ContainerKind::caf:
-        return kSingleInCAF;
-    default:
-        return {};
-    }
-}
 
 /// Whether four bytes may be a chunk's name.
 bool isName(const std::byte* bytes)
@@ -67,11 +40,16 @@ private:
     void checkContainerSize();
     void checkPlace(const WalkedChunk& chunk);
     void checkSize(const WalkedChunk& chunk);
+    void checkBody(const WalkedChunk& chunk);
+    void checkTable(const WalkedChunk& chunk);
+    void checkList(const WalkedChunk& chunk);
     bool checkPad(const WalkedChunk& chunk);
     void checkEnd();
+    std::uint64_t chunksBehind(std::uint64_t position);
     void checkSound(const AudioDescription& sound);
     void checkCounts(const AudioDescription& sound);
     void checkFact(const AudioDescription& sound);
+    void checkByteRate(const StreamDescription& stream);
 
     HeaderWindow& window_;
     std::vector<ContainerFinding>& findings_;
@@ -79,7 +57,7 @@ private:
     std::optional<std::uint64_t> statedEnd_;           // none where the container's size is open, or its kind has none
     std::unordered_map<FourCC, std::uint64_t> places_; // of the first chunk of each id that may stand once
     std::uint64_t formatAt_ = 0, soundAt_ = 0, factAt_ = 0;
-    std::optional<std::uint32_t> factFrames_;
+    std::optional<std::uint32_t> factFrames_, byteRate_;
 };
 
 void Check::add(const ContainerFinding& finding)
@@ -100,6 +78,8 @@ std::int32_t Check::run()
         describer.meet(chunk);
         checkPlace(chunk);
         checkSize(chunk);
+        if (chunk.hasItsBytes(window_.length()))
+            checkBody(chunk);
         isLost = !checkPad(chunk);
     }
     if (!isLost)
@@ -125,6 +105,9 @@ void Check::checkContainerSize()
         stated = whole > aheadOfSize && whole < openSize64 ? whole - aheadOfSize : 0;
     } else if (const std::byte* size = window_.at(4, sizeof(std::uint32_t)); size != nullptr) {
         const auto field = load<std::uint32_t>(size, traits().order);
+        const std::uint64_t size64 = container().header.HasValidDs64() ? std::uint64_t{container().header.riffSize} : 0;
+        if (size64 != 0 && field != kOpenField && field != size64)
+            add({.kind = Kind::sizes64Differ, .chunk = container().id, .stated = field, .found = size64});
         const bool isElsewhere = field == kOpenField && container().header.HasValidDs64();
         stated = isElsewhere ? std::uint64_t{container().header.riffSize} : field == kOpenField ? 0 : field;
     }
@@ -141,8 +124,7 @@ void Check::checkContainerSize()
 void Check::checkPlace(const WalkedChunk& chunk)
 {
     const ContainerKind kind = traits().kind;
-    const auto singles = singleChunksOf(kind);
-    const bool isSingle = std::ranges::find(singles, chunk.id) != singles.end();
+    const bool isSingle = isSingleChunk(kind, chunk.id);
     const auto [first, isFirst] = isSingle ? places_.emplace(chunk.id, chunk.position) : std::pair(places_.end(), true);
     if (!isFirst) {
         add({.kind = Kind::repeated, .chunk = chunk.id, .offset = chunk.position, .stated = first->second});
@@ -152,15 +134,19 @@ void Check::checkPlace(const WalkedChunk& chunk)
         add({.kind = Kind::chunkBehind, .chunk = chunk.id, .offset = chunk.position, .stated = *statedEnd_});
     if (chunk.id == traits().formatId) {
         formatAt_ = chunk.position;
+        const bool isWAVE = traits().formatId == fourCC("fmt ");
+        if (const std::byte* rate = isWAVE && chunk.size >= 12 ? window_.at(chunk.body + 8, 4) : nullptr;
+            rate != nullptr)
+            byteRate_ = load<std::uint32_t>(rate, traits().order);
         const bool mustBeFirst = kind == ContainerKind::caf && chunk.position != traits().firstChunk;
         const bool isBehindSound = kind != ContainerKind::iff && soundAt_ != 0;
         if (mustBeFirst || isBehindSound)
             add({.kind = Kind::formatIsLate, .chunk = chunk.id, .offset = chunk.position});
     } else if (chunk.id == traits().soundId) {
         soundAt_ = chunk.position;
-    } else if (chunk.id == fourCC("fact") && chunk.size >= 4) {
+    } else if (chunk.id == fourCC("fact")) {
         factAt_ = chunk.position;
-        if (const std::byte* frames = window_.at(chunk.body, 4); frames != nullptr)
+        if (const std::byte* frames = chunk.size >= 4 ? window_.at(chunk.body, 4) : nullptr; frames != nullptr)
             factFrames_ = load<std::uint32_t>(frames, traits().order);
     }
 }
@@ -192,6 +178,56 @@ void Check::checkSize(const WalkedChunk& chunk)
              .offset = chunk.position,
              .stated = *statedEnd_,
              .found = chunk.body + size});
+}
+
+/// What the chunk itself holds.
+void Check::checkBody(const WalkedChunk& chunk)
+{
+    const std::byte* const name = traits().hasChunks ? window_.at(chunk.position, sizeof(FourCC)) : nullptr;
+    if (name != nullptr && !isName(name))
+        add({.kind = Kind::idIsNoName, .chunk = chunk.id, .offset = chunk.position});
+    const auto size = static_cast<std::uint64_t>(chunk.size);
+    if (const std::uint32_t least = leastSizeOfChunk(traits().kind, chunk.id); size < least)
+        add({.kind = Kind::chunkIsShort, .chunk = chunk.id, .offset = chunk.position, .stated = least, .found = size});
+    if (chunk.id == kDs64 && chunk.position == traits().firstChunk)
+        checkTable(chunk);
+    if (chunk.id == fourCC("LIST") && traits().chunkHeaderSize == sizeof(ChkHeader))
+        checkList(chunk);
+}
+
+/// The sizes of further chunks, behind those that every "ds64" has.
+void Check::checkTable(const WalkedChunk& chunk)
+{
+    constexpr std::uint64_t fixedSize = 28, entrySize = 12;
+    const std::byte* const count = chunk.size >= std::int64_t{fixedSize} ? window_.at(chunk.body + 24, 4) : nullptr;
+    if (count == nullptr)
+        return;
+    const std::uint64_t room = (static_cast<std::uint64_t>(chunk.size) - fixedSize) / entrySize;
+    if (const auto entries = loadLE<std::uint32_t>(count); entries > room)
+        add({.kind = Kind::tableIsShort,
+             .chunk = chunk.id,
+             .offset = chunk.position,
+             .stated = entries,
+             .found = room});
+}
+
+/// The chunks in a chunk: the first that does not fit ends it, as it does for readers.
+void Check::checkList(const WalkedChunk& chunk)
+{
+    const std::uint64_t end = chunk.body + static_cast<std::uint64_t>(chunk.size);
+    for (std::uint64_t at = chunk.body + sizeof(FourCC); at + sizeof(ChkHeader) <= end;) {
+        const std::byte* const header = window_.at(at, sizeof(ChkHeader));
+        if (header == nullptr || loadBE<FourCC>(header) == 0) // room behind the last
+            return;
+        const auto id = loadBE<FourCC>(header);
+        const std::uint64_t size = load<std::uint32_t>(header + sizeof(FourCC), traits().order);
+        const std::uint64_t bodyEnd = at + sizeof(ChkHeader) + size;
+        if (bodyEnd > end) {
+            add({.kind = Kind::chunkReachesOut, .chunk = id, .offset = at, .stated = end, .found = bodyEnd});
+            return;
+        }
+        at = bodyEnd + (size & 1);
+    }
 }
 
 /// False where nobody can tell how the chunks go on: a byte that is not zero is taken for the start of the next one by
@@ -232,12 +268,34 @@ void Check::checkEnd()
         add({.kind = Kind::noChunk, .chunk = container().id, .offset = end, .found = limit - end});
     const bool isOwnPad =
         statedEnd_ && end == length && length - *statedEnd_ == 1; // which the container does not count
-    if (statedEnd_ && *statedEnd_ < length && !isOwnPad)
+    if (!statedEnd_ || *statedEnd_ >= length || isOwnPad)
+        return;
+    if (const std::uint64_t behind = chunksBehind(*statedEnd_); behind < length)
         add({.kind = Kind::bytesBehind,
              .chunk = container().id,
-             .offset = *statedEnd_,
+             .offset = behind,
              .stated = *statedEnd_,
-             .found = length - *statedEnd_});
+             .found = length - behind});
+}
+
+/// Tells of the chunks that stand behind the container, as programs leave them that do not count them, and gives the
+/// end of the last. What only looks like one does not end with the file or at another.
+std::uint64_t Check::chunksBehind(std::uint64_t position)
+{
+    const std::uint64_t length = window_.length();
+    while (traits().chunkHeaderSize == sizeof(ChkHeader) && length - position >= sizeof(ChkHeader)) {
+        const std::byte* const header = window_.at(position, sizeof(ChkHeader));
+        if (!isName(header))
+            break;
+        const std::uint64_t size = load<std::uint32_t>(header + sizeof(FourCC), traits().order);
+        if (size > length - position - sizeof(ChkHeader))
+            break;
+        const FourCC id = loadBE<FourCC>(header);
+        if (id != traits().formatId && id != traits().soundId) // which were met: readers look for them there
+            add({.kind = Kind::chunkBehind, .chunk = id, .offset = position, .stated = statedEnd_.value_or(0)});
+        position = std::min(position + sizeof(ChkHeader) + size + (size & 1), length);
+    }
+    return position;
 }
 
 void Check::checkSound(const AudioDescription& sound)
@@ -277,8 +335,13 @@ void Check::checkCounts(const AudioDescription& sound)
     const StreamDescription& stream = sound.stream();
     if (factFrames_)
         checkFact(sound);
+    else if (factAt_ == 0 && stream.framesPerPacket != 1 && traits().formatId == fourCC("fmt ") &&
+             !container().header.HasValidDs64())
+        add({.kind = Kind::factIsMissing, .chunk = fourCC("fact")});
     if (!stream.isLinearPCM())
         return;
+    if (byteRate_)
+        checkByteRate(stream);
     const std::uint64_t there = sound.dataSize / stream.bytesPerFrame;
     if (traits().kind == ContainerKind::iff) {
         const std::uint64_t counted = sound.format->countedPackets;
@@ -293,6 +356,18 @@ void Check::checkCounts(const AudioDescription& sound)
              .offset = traits().firstChunk,
              .stated = header.sampleCount,
              .found = there});
+}
+
+/// Which players take for the length of sound that they do not measure.
+void Check::checkByteRate(const StreamDescription& stream)
+{
+    const auto real = static_cast<std::uint64_t>(stream.sampleRate * stream.bytesPerFrame);
+    if (*byteRate_ != real)
+        add({.kind = Kind::byteRateDiffers,
+             .chunk = traits().formatId,
+             .offset = formatAt_,
+             .stated = *byteRate_,
+             .found = real});
 }
 
 /// Of codings without packets of one size only the decoder can tell.

@@ -17,6 +17,8 @@ struct ContainerFinding {
         bytesBehind,     // stated: where the container ends; found: how many bytes follow
         chunkBehind,     // the chunk begins where the container has ended, at `stated`
         chunkReachesOut, // stated: where the container ends; found: where the chunk does
+        chunkIsShort,    // stated: how many bytes every such chunk has; found: how many this has
+        idIsNoName,      // the chunk's name is not four printable characters
         chunkIsCut,      // stated: the size of the body; found: how much of it is there
         sizeIsOpen,      // never filled in; found: how many bytes there are to the end of the file
         countIsOpen,     // the number of frames was never filled in; found: how many there are
@@ -29,9 +31,14 @@ struct ContainerFinding {
         formatIsWrong,   // says what cannot be: no channels, no rate, frames of another size than their samples
         soundIsMissing,
         soundIsUneven,     // stated: bytes of a frame; found: how many are left over behind the last
+        byteRateDiffers,   // the format says `stated` bytes in a second, there are `found`
+        factIsMissing,     // of a coding whose frames only it counts
         framesDiffer,      // the chunk counts `stated` frames, there are `found`
         sizes64AreMissing, // a 64-bit WAVE file without a "ds64"
-        sizes64Differ      // stated: the chunk's own size; found: what the "ds64" says of it
+        sizes64Differ,     // stated: the own size of the chunk, or of the container; found: what the "ds64" says of it
+        tableIsShort,      // stated: entries that a "ds64" counts; found: those that it has room for
+        digestIsWrong,     // found: its size in bytes, which is that of no MD5
+        digestDiffers      // the MD5 that the chunk states is not that of the samples
     };
 
     Kind kind;

@@ -1,4 +1,4 @@
-#include "tool/adm/AdmSource.h"
+#include "tool/shared/adm/AdmSource.h"
 
 #include "tool/shared/edits/EditProblems.h"
 #include "tool/shared/input/ChunkBody.h"
@@ -48,7 +48,7 @@ bool looksLikeXml(std::string_view head)
 
 } // namespace
 
-AdmSource::AdmSource(const std::string& path)
+AdmSource::AdmSource(const std::string& path, Document document)
 {
     requireOK(file_.OpenForChunks(referenceTo(path), 0));
     const std::int64_t length = file_.GetEOF();
@@ -56,13 +56,16 @@ AdmSource::AdmSource(const std::string& path)
         throw OtherKind("is empty", OtherKind::Kind::unknown);
     if (file_.HasChunks()) {
         isAudio_ = true;
-        if (!surveyChunks(file_, fourCC("axml")).found)
+        if (const bool isThere = surveyChunks(file_, fourCC("axml")).found.has_value(); !isThere) {
+            if (document == Document::mayLack)
+                return;
             throw OtherKind("has no chunk \"axml\"", OtherKind::Kind::audio);
+        }
         const ChunkBody chunk = requireChunk(file_, fourCC("axml"));
         begin_ = chunk.offset;
         end_ = chunk.offset + chunk.size;
         dropTrailingNuls();
-        if (size() == 0)
+        if (size() == 0 && document == Document::isThere)
             throw Failure("its chunk \"axml\" is empty");
         return;
     }

@@ -12,11 +12,16 @@
 /// An open file, read in pieces.
 class AdmSource {
 public:
+    /// Whether a container may lack the chunk.
+    enum class Document : bool { isThere, mayLack };
+
     /// Throws Failure: also for what is neither XML nor a container, and for a container without the chunk.
-    explicit AdmSource(const std::string& path);
+    explicit AdmSource(const std::string& path, Document document = Document::isThere);
 
     /// Whether the XML is a chunk of an audio file.
     bool isAudio() const { return isAudio_; }
+    /// False for a container that lacks it.
+    bool hasDocument() const { return end_ > begin_; }
     int channels() const { return file_.Info().channels; }
     /// What there is of the body of the chunk "chna"; null where there is no such chunk.
     std::optional<Bytes> trackChunk();

@@ -1,0 +1,12 @@
+// Names, IDs and numbers of ADM documents in sentences.
+#pragma once
+
+#include <string>
+#include <string_view>
+
+/// The start of a very long text, for one that is told again and again: of names of 16 KB a small document could make
+/// gigabytes.
+std::string shortened(const std::string& text);
+
+/// "1 object", "4,000 objects".
+std::string countText(std::size_t count, std::string_view noun);

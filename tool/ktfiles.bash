@@ -26,7 +26,9 @@ _ktfiles()
         decode/--format) COMPREPLY=($(compgen -W 'wav aiff caf raw' -- "$cur")); return ;;
         decode/--bits) COMPREPLY=($(compgen -W '16 24 32 f32' -- "$cur")); return ;;
         decode/--rate) COMPREPLY=($(compgen -W '44100 48000 88200 96000' -- "$cur")); return ;;
-        decode/--channels | */--frames) return ;;
+        overview/--format) COMPREPLY=($(compgen -W 'audiowaveform' -- "$cur")); return ;;
+        overview/--channels) COMPREPLY=($(compgen -W 'split sum 1 2' -- "$cur")); return ;;
+        decode/--channels | */--frames | */--frames-per-point) return ;;
     esac
     case $prev in
         --color) COMPREPLY=($(compgen -W 'auto always never' -- "$cur")); return ;;
@@ -58,7 +60,7 @@ _ktfiles()
             adm/*) COMPREPLY=($(compgen -W "--long --lenient --check --threads $files $common" -- "$cur")) ;;
             tags/set | tags/remove | tags/copy) COMPREPLY=($(compgen -W "$files $edit $common" -- "$cur")) ;;
             overview/*) COMPREPLY=($(compgen -W "--png --svg --width --height --start --end --frames --scale --colors
-                --force --stored --store --threads $files $edit $common" -- "$cur")) ;;
+                --channels --format --output --frames-per-point --force --stored --store --threads $files $edit $common" -- "$cur")) ;;
             decode/*) COMPREPLY=($(compgen -W "--output --format --rate --channels --bits --start --end --frames --conceal
                 --force --threads $files $common" -- "$cur")) ;;
             lock/*) COMPREPLY=($(compgen -W "--read --write --presenter --timeout -- $common" -- "$cur")) ;;

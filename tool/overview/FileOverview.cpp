@@ -1,49 +1,25 @@
 #include "tool/overview/FileOverview.h"
 
-#include "loops/overview/MDOverview.h"
 #include "loops/overview/StoredOverview.h"
 #include "tool/shared/input/InputFile.h"
 #include "tool/shared/output/Failure.h"
 #include "tool/shared/output/Progress.h"
-#include "tool/shared/output/Terminal.h"
-#include "tool/shared/output/UnseenCharacters.h"
 
-#include <fmt/format.h>
-
-#include <cstdio>
-
-namespace {
-
-constexpr double kLowestRate = 0.001, kHighestRate = 1e9; // of what has a place in time
-
-void requireSound(const AudioFileInfo& info)
-{
-    if (!info.compressed && !info.IsLinearPCM())
-        throw Failure("holds samples of a kind that is not read");
-    if (info.channels > MDOverview::kMostChannels)
-        throw Failure(
-            fmt::format("has {} channels; an overview folds {} at most", info.channels, MDOverview::kMostChannels));
-    if (info.frames == 0)
-        throw Failure("holds no sound");
-}
-
-} // namespace
-
-FileOverview FileOverview::computed(const std::string& path, bool showsProgress)
+FileOverview FileOverview::described(const SoundReader& sound)
 {
     FileOverview overview;
-    CAudioFileIO file;
-    openAudio(file, path);
-    requireDecoder(file);
-    overview.info_ = file.Info();
-    requireSound(overview.info_);
-    if (overview.info_.missingDataSize > 0)
-        overview.note_ = fmt::format("ends ahead of its sound, {} bytes of which are missing; what is there is shown",
-                                     overview.info_.missingDataSize);
+    overview.info_ = sound.info();
+    overview.note_ = sound.note();
+    return overview;
+}
+
+FileOverview FileOverview::computed(SoundReader& sound, bool showsProgress)
+{
+    FileOverview overview = described(sound);
     Progress progress("reading", overview.info_.frames, !showsProgress);
     long long done = 0;
     std::int32_t status = kStatusOK;
-    overview.block_ = file.CreateOverview(
+    overview.block_ = sound.file().CreateOverview(
         [&](long long framesDone, long long) {
             progress.advance(framesDone - std::exchange(done, framesDone));
             return true;
@@ -79,9 +55,6 @@ Waveform FileOverview::waveform() const
     // The header of a block counts no further than 32 bits.
     const bool fits = OverviewPointCount(info_.frames) == static_cast<std::int64_t>(waveform.points.size());
     waveform.frames = fits ? info_.frames : OverviewFrames(*block_);
-    // A CAF file may claim any rate that a 64-bit float can hold, and times of it are drawn.
-    if (!(info_.exactSampleRate >= kLowestRate && info_.exactSampleRate <= kHighestRate))
-        throw Failure(fmt::format("has a sample rate of {:g} Hz", info_.exactSampleRate));
-    waveform.sampleRate = info_.exactSampleRate;
+    waveform.sampleRate = sampleRateOf(info_);
     return waveform;
 }

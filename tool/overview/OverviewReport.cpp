@@ -74,14 +74,14 @@ OverviewReport::OverviewReport(const OutputOptions& options, const FileArguments
 
 void OverviewReport::add(const std::string& path, const FileOverview& overview, const OverviewDeeds& deeds)
 {
-    const Waveform waveform = overview.waveform();
     if (form_ == Form::json) {
-        addJson(path, overview, waveform, deeds);
+        addJson(path, overview, deeds);
     } else if (form_ != Form::none && deeds.any()) {
-        addDeeds(path, waveform, deeds);
+        addDeeds(path, overview, deeds);
     } else if (form_ == Form::table) {
-        addSparkline(path, waveform);
+        addSparkline(path, overview.waveform());
     } else if (form_ == Form::lines) {
+        const Waveform waveform = overview.waveform();
         const OverviewPoint range = extremes(waveform);
         output_.print("{}\t{:.6f}\t{}\t{}\t{}\t{}\n", printable(path), waveform.seconds(), waveform.frames,
                       range.minimum, range.maximum, sparkline(waveform, kSparklineInPipes));
@@ -99,19 +99,22 @@ void OverviewReport::addSparkline(const std::string& path, const Waveform& wavef
                   color_ ? "\x1b[36m" : "", sparkline(waveform, cells), color_ ? "\x1b[0m" : "");
 }
 
-void OverviewReport::addDeeds(const std::string& path, const Waveform& waveform, const OverviewDeeds& deeds)
+void OverviewReport::addDeeds(const std::string& path, const FileOverview& overview, const OverviewDeeds& deeds)
 {
     for (const std::string& out : {deeds.png, deeds.svg})
         if (!out.empty() && out != "-")
             output_.print("{}: drawn to {}, {} x {}\n", printable(path), printable(out), deeds.width, deeds.height);
+    if (!deeds.data.empty() && deeds.data != "-")
+        output_.print("{}: written to {}\n", printable(path), printable(deeds.data));
     if (deeds.store)
-        output_.print("{}: {}{}\n", printable(path), storeText(*deeds.store, deeds.dryRun, waveform.points.size()),
+        output_.print("{}: {}{}\n", printable(path),
+                      storeText(*deeds.store, deeds.dryRun, overview.waveform().points.size()),
                       deeds.store->backup.empty() ? "" : "; backup " + printable(deeds.store->backup));
 }
 
-void OverviewReport::addJson(const std::string& path, const FileOverview& overview, const Waveform& waveform,
-                             const OverviewDeeds& deeds)
+void OverviewReport::addJson(const std::string& path, const FileOverview& overview, const OverviewDeeds& deeds)
 {
+    const Waveform waveform = overview.waveform();
     JsonWriter& json = json_.begin();
     json.beginObject();
     json.member("path", path).member("sampleRate", overview.info().sampleRate);
@@ -121,7 +124,7 @@ void OverviewReport::addJson(const std::string& path, const FileOverview& overvi
     for (const OverviewPoint& point : waveform.points)
         json.beginArray().write(point.minimum).write(point.maximum).endArray();
     json.endArray();
-    json.knownMember("png", deeds.png).knownMember("svg", deeds.svg);
+    json.knownMember("png", deeds.png).knownMember("svg", deeds.svg).knownMember("output", deeds.data);
     if (deeds.store) {
         json.member("stored", deeds.store->stored).member("changed", deeds.store->changed);
         json.member("dryRun", deeds.dryRun).knownMember("backup", deeds.store->backup);

@@ -12,12 +12,12 @@
 
 /// What was done with a file's overview beside showing it.
 struct OverviewDeeds {
-    std::string png, svg; // the files that were drawn; empty or "-": none to tell of
+    std::string png, svg, data; // the files that were written; empty or "-": none to tell of
     int width = 0, height = 0;
     std::optional<StoreResult> store;
     bool dryRun = false;
 
-    bool any() const { return !png.empty() || !svg.empty() || store; }
+    bool any() const { return !png.empty() || !svg.empty() || !data.empty() || store; }
 };
 
 class OverviewReport {
@@ -25,15 +25,15 @@ public:
     /// The files that will come are for the width of the names.
     OverviewReport(const OutputOptions& options, const FileArguments& files);
 
+    /// The overview has points unless there are deeds to tell of, and no JSON to write.
     void add(const std::string& path, const FileOverview& overview, const OverviewDeeds& deeds);
     void addFailure(const std::string& path, const std::string& text);
     void finish();
 
 private:
     void addSparkline(const std::string& path, const Waveform& waveform);
-    void addDeeds(const std::string& path, const Waveform& waveform, const OverviewDeeds& deeds);
-    void addJson(const std::string& path, const FileOverview& overview, const Waveform& waveform,
-                 const OverviewDeeds& deeds);
+    void addDeeds(const std::string& path, const FileOverview& overview, const OverviewDeeds& deeds);
+    void addJson(const std::string& path, const FileOverview& overview, const OverviewDeeds& deeds);
 
     Form form_;
     bool color_;

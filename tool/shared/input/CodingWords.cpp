@@ -168,6 +168,25 @@ std::string layoutWord(const AudioFileInfo& info)
     return words;
 }
 
+// Decoders give channels in the order of the mask, and WAVE has them so; other containers of linear PCM have an order
+// of their own, of which the mask does not tell.
+std::vector<std::string> channelWords(const AudioFileInfo& info)
+{
+    const bool isInOrder = info.compressed || info.fileType == kWAVE;
+    const std::uint32_t known = info.speakers != 0 ? info.speakers : info.channels == 2 ? 0x3 : 0;
+    std::vector<std::string> words;
+    if (isInOrder || known == 0x3)
+        for (std::size_t i = 0; i < std::size(speakers); ++i)
+            if ((known >> i & 1) != 0)
+                words.emplace_back(speakers[i]);
+    if (words.size() == static_cast<std::size_t>(info.channels))
+        return words;
+    words.clear();
+    for (int channel = 1; channel <= info.channels; ++channel)
+        words.push_back(fmt::format("Ch {}", channel));
+    return words;
+}
+
 std::string formatWords(const AudioFileInfo& info)
 {
     if (info.dsdRate > 0) {

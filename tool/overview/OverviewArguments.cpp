@@ -1,0 +1,132 @@
+#include "tool/overview/OverviewArguments.h"
+
+#include "tool/shared/arguments/SoundRange.h"
+#include "tool/shared/arguments/ThreadsOption.h"
+
+#include <unistd.h>
+
+namespace {
+
+constexpr std::pair kWidths{16, 16384};
+constexpr std::pair kHeights{8, 4096};
+constexpr std::pair kFramesPerPoint{1, 1 << 24};
+
+void addSize(Verb& verb, const std::string& name, int& pixels, std::pair<int, int> range)
+{
+    verb.addNumber(name, pixels, range,
+                   fmt::format("Its size in pixels, {} to {}; else {}", range.first, range.second, pixels));
+}
+
+void addPictureOptions(Verb& verb, OverviewArguments& arguments)
+{
+    CommandLine::addPath(verb, "--png", arguments.png, "Draw a PNG; \"-\" is standard output").label("OUT");
+    CommandLine::addPath(verb, "--svg", arguments.svg, "Draw an SVG; \"-\" is standard output").label("OUT");
+    CommandLine::addForceOption(verb, arguments.existing);
+    addSize(verb, "--width", arguments.picture.width, kWidths);
+    addSize(verb, "--height", arguments.picture.height, kHeights);
+    addSoundRange(verb, {.start = [&arguments](const SoundLength& start) { arguments.start = start; },
+                         .end = [&arguments](const SoundLength& end) { arguments.end = end; },
+                         .frames = [&arguments](const SoundLength& frames) { arguments.frames = frames; }});
+    const auto takeChannels = [&arguments](const std::string& text) {
+        arguments.channels = channelChoiceFromText(text).value_or(arguments.channels);
+    };
+    const auto channelsProblem = [](const std::string& text) {
+        return channelChoiceFromText(text) ? "" : "\"" + printable(text) + "\" is neither split, sum nor a number";
+    };
+    verb.addText("--channels", takeChannels, "split: each by itself; sum: their average; or the number of one of them",
+                 channelsProblem)
+        .label("CHANNELS");
+    verb.addFlag("--scale", arguments.picture.scale, "Show a scale of the amplitude, in decibels");
+    const auto takeColors = [&arguments](const std::string& text) {
+        arguments.colors = colorsFromText(text).value_or(arguments.colors);
+    };
+    const auto colorsProblem = [](const std::string& text) {
+        return colorsFromText(text) ? ""
+                                    : "\"" + printable(text) + "\" is neither WAVE,BACKGROUND[,AXIS], as in " +
+                                          "1f6feb,ffffff, nor one of " + themeNames();
+    };
+    verb.addText("--colors", takeColors,
+                 "WAVE,BACKGROUND[,AXIS] as RRGGBB, the background also none; or one of: " + themeNames(),
+                 colorsProblem)
+        .label("COLORS");
+}
+
+void addDataOptions(Verb& verb, OverviewArguments& arguments)
+{
+    static std::string format;
+    verb.addText("--format", format, "audiowaveform: write waveform data as its players read it, version 2, 8 bits",
+                 [](const std::string& text) {
+                     return text == "audiowaveform" ? "" : "\"" + printable(text) + "\" is not audiowaveform";
+                 })
+        .label("FORMAT");
+    CommandLine::addPath(verb, "-o,--output", arguments.data,
+                         "Where --format writes to: a name that ends with .json or .dat; \"-\" is JSON")
+        .label("OUT");
+    verb.addNumber("--frames-per-point", arguments.framesPerPoint, kFramesPerPoint,
+                   "Sample frames for each point of the data; else 256");
+}
+
+void requireNothingElseGiven(const Verb& verb, std::initializer_list<const char*> options, const std::string& why)
+{
+    for (const char* const option : options)
+        if (verb.isGiven(option))
+            throw UsageError(option + why);
+}
+
+void requireSenseOfData(const OverviewArguments& arguments, const Verb& verb)
+{
+    if (verb.isGiven("--format") != !arguments.data.empty())
+        throw UsageError(verb.isGiven("--format") ? "--format needs --output, which says where to"
+                                                  : "--output needs --format, which says what to write");
+    if (arguments.data.empty()) {
+        requireNothingElseGiven(verb, {"--frames-per-point"}, " is about --format");
+        return;
+    }
+    if (!audiowaveformFormatOf(arguments.data))
+        throw UsageError("the name of the output ends with .json or .dat, which says what to write");
+    if (arguments.files.maybeSeveral())
+        throw UsageError("--format writes of one file at a time");
+    if (arguments.fromStored)
+        throw UsageError("--format is made of the sound, not of --stored");
+}
+
+} // namespace
+
+void declareArguments(Verb& verb, OverviewArguments& arguments)
+{
+    CommandLine::addFiles(verb, arguments.files);
+    addThreads(verb, arguments.threads);
+    addPictureOptions(verb, arguments);
+    addDataOptions(verb, arguments);
+    verb.addFlag("--stored", arguments.fromStored, "Take the overview that is stored in the file, not the sound");
+    verb.addFlag("--store", arguments.store, "Store the overview in the file");
+    CommandLine::addEditOptions(verb, arguments.edit);
+}
+
+void requireSense(const OverviewArguments& arguments, const Verb& verb, const OutputOptions& output)
+{
+    if (arguments.draws() && arguments.files.maybeSeveral())
+        throw UsageError("--png and --svg draw one file at a time");
+    if (!arguments.draws())
+        requireNothingElseGiven(verb, {"--width", "--height", "--colors", "--scale"},
+                                " is about a picture: --png or --svg says where to");
+    if (!arguments.writes())
+        requireNothingElseGiven(verb, {"--start", "--end", "--frames", "--channels", "--force"},
+                                " is about a picture or --format: --png, --svg or --output says where to");
+    if (!arguments.store)
+        requireNothingElseGiven(verb, {"--in-place", "--dry-run", "--backup", "--keep-times", "--timeout"},
+                                " is about --store");
+    if (arguments.store && arguments.fromStored)
+        throw UsageError("--store computes the overview, --stored does not");
+    requireSenseOfData(arguments, verb);
+    requireOrder(arguments.start, arguments.end);
+    const std::string* const outputs[] = {&arguments.png, &arguments.svg, &arguments.data};
+    for (std::size_t i = 0; i < std::size(outputs); ++i)
+        for (std::size_t j = 0; j < i; ++j)
+            if (!outputs[i]->empty() && *outputs[i] == *outputs[j])
+                throw UsageError("two outputs have the same name");
+    if (arguments.takesOutput() && output.wantsJson())
+        throw UsageError("JSON and a picture cannot both go to standard output");
+    if (arguments.png == "-" && isTerminal(STDOUT_FILENO))
+        throw UsageError("a PNG does not go to a terminal: name a file");
+}

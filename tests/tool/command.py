@@ -1,5 +1,6 @@
 """The command as a process, and small containers built by hand, for the tests beside this file."""
 import atexit
+import fcntl
 import json
 import os
 import pathlib
@@ -9,6 +10,7 @@ import shutil
 import struct
 import subprocess
 import tempfile
+import termios
 import unittest
 
 import schemas
@@ -16,6 +18,7 @@ import schemas
 KTFILES = os.environ["KTFILES"]
 # Nothing of the tests shows in the user's own folder, and runs side by side do not wait for each other.
 os.environ["KTFILES_COORDINATION"] = tempfile.mkdtemp(prefix="ktfiles-coordination-")
+os.environ.pop("COLUMNS", None)
 atexit.register(shutil.rmtree, os.environ["KTFILES_COORDINATION"], ignore_errors=True)
 MEDIA = pathlib.Path(os.environ["KTFILES_MEDIA"])
 # What the command is linked to.
@@ -101,11 +104,12 @@ class CommandTest(unittest.TestCase):
             self.assertTrue(error.startswith("ktfiles: "), error)
         return error
 
-    def on_terminal(self, *arguments, **environment):
-        """What the command writes to a terminal, and its exit status."""
+    def on_terminal(self, *arguments, columns=0, **environment):
+        """What the command writes to a terminal, of a width that it tells unless that is 0, and its exit status."""
         process, terminal = pty.fork()
         if process == 0:
             os.chdir(self.folder)
+            fcntl.ioctl(1, termios.TIOCSWINSZ, struct.pack("HHHH", 24, columns, 0, 0))
             os.execve(KTFILES, [KTFILES, *arguments], {**os.environ, "TERM": "xterm", **environment})
         text = b""
         while True:

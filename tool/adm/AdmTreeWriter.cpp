@@ -1,5 +1,6 @@
 #include "tool/adm/AdmTreeWriter.h"
 
+#include "tool/shared/output/DisplayWidth.h"
 #include "tool/shared/output/Terminal.h"
 
 #include <algorithm>

@@ -162,10 +162,14 @@ void writeJson(JsonWriter& json, const std::string& path, const Description& des
 
 std::vector<Table::Column> columns(const InfoOptions& wanted)
 {
-    std::vector<Table::Column> titles{{"FILE"},   {"TYPE"},    {"DURATION", Align::right}, {"RATE", Align::right},
-                                      {"FORMAT"}, {"CHANNELS"}};
-    if (wanted.isLong)
-        titles.insert(titles.end(), {{"BY NAME"}, {"MODIFIED"}, {"STEREO PARTNER"}});
+    std::vector<Table::Column> titles{
+        {.title = "FILE", .isCuttable = true},        {.title = "TYPE", .dropRank = 5},
+        {.title = "DURATION", .align = Align::right}, {.title = "RATE", .align = Align::right, .dropRank = 7},
+        {.title = "FORMAT", .dropRank = 6},           {.title = "CHANNELS", .dropRank = wanted.isLong ? 4 : 8}};
+    if (wanted.isLong) // what was asked for is left out last
+        titles.insert(titles.end(), {{.title = "BY NAME", .dropRank = 3},
+                                     {.title = "MODIFIED", .dropRank = 1},
+                                     {.title = "STEREO PARTNER", .dropRank = 2, .isCuttable = true}});
     if (wanted.wantsMD5)
         titles.push_back({"MD5"});
     if (wanted.wantsSHA256)

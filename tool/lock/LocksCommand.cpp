@@ -65,7 +65,11 @@ private:
     bool color_;
     Output& output_ = Output::standard();
     JsonRecords json_;
-    Table table_{{{"FILE"}, {"ROLE"}, {"ACCESS"}, {"PROCESS", Align::right}, {"COMMAND"}}};
+    Table table_{{{.title = "FILE", .isCuttable = true},
+                  {.title = "ROLE"},
+                  {.title = "ACCESS", .dropRank = 2},
+                  {.title = "PROCESS", .align = Align::right},
+                  {.title = "COMMAND", .dropRank = 1, .isCuttable = true}}};
 };
 
 std::vector<CoordinationParty> allParties()

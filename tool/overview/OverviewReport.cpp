@@ -3,6 +3,7 @@
 #include "tool/overview/Sparkline.h"
 #include "tool/shared/input/FolderWalk.h"
 #include "tool/shared/output/ClockTime.h"
+#include "tool/shared/output/DisplayWidth.h"
 #include "tool/shared/output/Terminal.h"
 
 #include <algorithm>
@@ -20,21 +21,6 @@ std::string withThousands(std::int64_t number)
     for (std::size_t i = digits.size(); i > 3; i -= 3)
         digits.insert(i - 3, ",");
     return digits;
-}
-
-// The end of a path says more than its beginning.
-std::string shortened(const std::string& name, int width)
-{
-    if (displayWidth(name) <= width)
-        return name;
-    std::string_view rest = name;
-    const auto isInside = [](char c) { return (static_cast<unsigned char>(c) & 0xC0) == 0x80; };
-    while (!rest.empty() && displayWidth(rest) > width - 1) {
-        rest.remove_prefix(1);
-        while (!rest.empty() && isInside(rest.front()))
-            rest.remove_prefix(1);
-    }
-    return "…" + std::string(rest);
 }
 
 OverviewPoint extremes(const Waveform& waveform)

@@ -55,7 +55,7 @@ private:
     bool color_;
     Output& output_ = Output::standard();
     JsonRecords json_;
-    Table table_{{{"LEFT"}, {"RIGHT"}, {"STATE"}}};
+    Table table_{{{.title = "LEFT", .isCuttable = true}, {.title = "RIGHT", .isCuttable = true}, {.title = "STATE"}}};
 };
 
 bool runPair(const FileArguments& files, const OutputOptions& options)

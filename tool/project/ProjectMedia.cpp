@@ -63,7 +63,8 @@ void printProjectMedia(const std::string& path, ProjectInformation& project, std
         writeRecord(options, [&](JsonWriter& json) {
             json.beginObject().member("path", path).key("media").writeJson(media.endArray().text()).endObject();
         });
-    printRows(rows, {{"KIND"}, {"STATE"}, {"FILE"}}, options);
+    printRows(rows, {{.title = "KIND", .dropRank = 1}, {.title = "STATE"}, {.title = "FILE", .isCuttable = true}},
+              options);
 }
 
 void printProjectDirectories(const std::string& path, const CFileRef& base, std::optional<long> alternative,
@@ -101,5 +102,7 @@ void printProjectDirectories(const std::string& path, const CFileRef& base, std:
             json.member("layout", static_cast<int>(GetProjectLayout(base)));
             json.key("directories").writeJson(directories.endArray().text()).endObject();
         });
-    printRows(rows, {{"TYPE", Align::right}, {"STATE"}, {"FOLDER"}}, options);
+    printRows(rows,
+              {{.title = "TYPE", .align = Align::right}, {.title = "STATE"}, {.title = "FOLDER", .isCuttable = true}},
+              options);
 }

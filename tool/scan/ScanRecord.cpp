@@ -162,13 +162,13 @@ ScanRecord scanFile(const FoundFile& item, ScanForm form)
 ScanWriter::ScanWriter(ScanForm form, const OutputOptions& options)
     : form_(form),
       color_(usesColor(options.color)),
-      table_({{"TEMPO", Align::right, 7},
-              {"BEATS", Align::right},
-              {"KEY", Align::left, 8},
-              {"SIGNATURE"},
-              {"CATEGORY", Align::left, 16},
-              {"GENRE", Align::left, 16},
-              {"FILE"}}),
+      table_({{.title = "TEMPO", .align = Align::right, .width = 7},
+              {.title = "BEATS", .align = Align::right, .dropRank = 2},
+              {.title = "KEY", .width = 8, .dropRank = 1},
+              {.title = "SIGNATURE", .dropRank = 4},
+              {.title = "CATEGORY", .width = 16, .dropRank = 3, .isCuttable = true},
+              {.title = "GENRE", .width = 16, .dropRank = 5, .isCuttable = true},
+              {.title = "FILE", .isCuttable = true}}),
       json_(options)
 {
     if (form_ != ScanForm::csv)

@@ -1,5 +1,6 @@
 #include "tool/shared/output/FilesProgress.h"
 
+#include "tool/shared/output/DisplayWidth.h"
 #include "tool/shared/output/Terminal.h"
 
 #include <fmt/format.h>

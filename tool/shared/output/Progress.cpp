@@ -1,5 +1,6 @@
 #include "tool/shared/output/Progress.h"
 
+#include "tool/shared/output/DisplayWidth.h"
 #include "tool/shared/output/Terminal.h"
 
 #include <fmt/core.h>

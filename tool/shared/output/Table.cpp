@@ -1,8 +1,19 @@
 #include "tool/shared/output/Table.h"
 
+#include "tool/shared/output/DisplayWidth.h"
 #include "tool/shared/output/Output.h"
 
 #include <algorithm>
+#include <limits>
+
+namespace {
+
+constexpr int kGap = 2;
+constexpr int kReadable = 20; // what is left of a name ahead of dropping a column for it
+constexpr int kLeast = 8;     // and when there is none to drop
+constexpr int kLeftOut = -1;
+
+} // namespace
 
 Table::Table(std::vector<Column> columns) : columns_(std::move(columns))
 {
@@ -17,7 +28,7 @@ void Table::add(std::vector<std::string> row)
     rows_.push_back(std::move(row));
 }
 
-void Table::print(Output& output, bool color) const
+void Table::print(Output& output, bool color)
 {
     if (rows_.empty())
         return;
@@ -26,8 +37,11 @@ void Table::print(Output& output, bool color) const
         printRow(output, row);
 }
 
-void Table::printTitles(Output& output, bool color) const
+void Table::printTitles(Output& output, bool color)
 {
+    if (rows_.empty() && columns_.back().isCuttable)
+        columns_.back().width = columnsOfOutput().value_or(0);
+    fit();
     std::vector<std::string> titles;
     for (const Column& column : columns_)
         titles.push_back(column.title);
@@ -36,17 +50,76 @@ void Table::printTitles(Output& output, bool color) const
 
 void Table::printRow(Output& output, const std::vector<std::string>& row, bool bold) const
 {
-    std::string line;
+    std::string line, gap;
     for (std::size_t i = 0; i < columns_.size(); ++i) {
-        const int missing = columns_[i].width - displayWidth(row[i]);
-        const std::string padding(static_cast<std::size_t>(std::max(missing, 0)), ' ');
-        const bool last = i + 1 == columns_.size();
-        if (columns_[i].align == Align::right)
-            line += padding + row[i];
-        else
-            line += last ? row[i] : row[i] + padding;
-        if (!last)
-            line += "  ";
+        if (widths_[i] == kLeftOut)
+            continue;
+        const bool isCut = isOnTerminal_ && columns_[i].isCuttable;
+        const std::string cell = isCut ? shortened(row[i], widths_[i]) : row[i];
+        const std::string padding(static_cast<std::size_t>(std::max(widths_[i] - displayWidth(cell), 0)), ' ');
+        const bool isRight = columns_[i].align == Align::right;
+        line += gap + (isRight ? padding + cell : cell);
+        gap = (isRight ? "" : padding) + std::string(kGap, ' '); // none behind the last
     }
+    line.erase(line.find_last_not_of(' ') + 1); // as of a last cell that is empty
     output.print("{}{}{}\n", bold ? "\x1b[1m" : "", line, bold ? "\x1b[0m" : "");
+}
+
+void Table::fit()
+{
+    widths_.clear();
+    for (const Column& column : columns_)
+        widths_.push_back(column.width);
+    const std::optional<int> limit = columnsOfOutput();
+    isOnTerminal_ = limit.has_value();
+    if (!limit)
+        return;
+    do
+        narrow(kReadable, *limit);
+    while (totalWidth() > *limit && dropColumn());
+    narrow(kLeast, *limit);
+}
+
+int Table::totalWidth() const
+{
+    int total = -kGap;
+    for (const int width : widths_)
+        total += width == kLeftOut ? 0 : width + kGap;
+    return total;
+}
+
+// Takes from the widest names first, and gives back what was taken for columns that are left out now.
+void Table::narrow(int least, int limit)
+{
+    for (std::size_t i = 0; i < columns_.size(); ++i)
+        if (widths_[i] != kLeftOut)
+            widths_[i] = columns_[i].width;
+    while (totalWidth() > limit) {
+        int* widest = nullptr;
+        for (std::size_t i = 0; i < columns_.size(); ++i)
+            if (columns_[i].isCuttable && widths_[i] > std::max(least, displayWidth(columns_[i].title)) &&
+                (widest == nullptr || widths_[i] > *widest))
+                widest = &widths_[i];
+        if (widest == nullptr)
+            return;
+        --*widest;
+    }
+}
+
+bool Table::dropColumn()
+{
+    const auto rank = [this](std::size_t i) {
+        const int given = widths_[i] == kLeftOut ? 0 : columns_[i].dropRank;
+        const bool isEmpty =
+            !rows_.empty() && std::ranges::all_of(rows_, [i](const auto& row) { return row[i].empty(); });
+        return given > 0 && isEmpty ? std::numeric_limits<int>::max() : given;
+    };
+    std::size_t first = 0;
+    for (std::size_t i = 1; i < columns_.size(); ++i)
+        if (rank(i) > rank(first))
+            first = i;
+    const bool isFound = rank(first) > 0;
+    if (isFound)
+        widths_[first] = kLeftOut;
+    return isFound;
 }

@@ -22,7 +22,7 @@ ARROWS = {
     "media/taglib": {"media/tags"},
     "files": {"platform"},
     "loops/tagging": {"platform/core"},
-    "audiofile/metadata": {"platform/core"},
+    "audiofile/metadata": {"loops/tagging", "platform/core"},
     "audiofile": {"files", "loops/tagging", "media/decoding", "platform"},
     "loops": {"audiofile", "files", "loops/tagging", "media/decoding", "platform"},
     "loops/overview": {"audiofile", "files", "media/samples", "platform"},

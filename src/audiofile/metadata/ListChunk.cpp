@@ -65,21 +65,32 @@ Bytes ListChunk::write() const
 void ListChunk::replaceBody(std::size_t index, Bytes body)
 {
     items_[index] = {.id = items_[index].id, .body = std::move(body)};
+    settlePadding();
 }
 
 void ListChunk::insert(std::size_t index, FourCC id, Bytes body)
 {
     // What ended with the list no longer does.
-    if (index != 0 && index == items_.size()) {
+    if (index != 0 && index == items_.size())
         items_.back().missing = 0;
-        items_.back().isPadded = true;
-    }
     items_.insert(items_.begin() + static_cast<std::ptrdiff_t>(index), {.id = id, .body = std::move(body)});
+    settlePadding();
 }
 
 void ListChunk::erase(std::size_t index)
 {
     items_.erase(items_.begin() + static_cast<std::ptrdiff_t>(index));
+    settlePadding();
+}
+
+// Whether a byte is padding was told by what followed, which an edit changes: from now on it tells itself.
+void ListChunk::settlePadding()
+{
+    for (ListItem& item : items_) {
+        item.isPadded = true;
+        if (isIdCharacter(item.pad))
+            item.pad = std::byte{0};
+    }
 }
 
 std::string textUpToNUL(BytesView text)

@@ -22,7 +22,7 @@ struct ListItem {
 };
 
 /// Published source: Multimedia Programming Interface and Data Specifications 1.0, LIST Chunk. What is not changed is
-/// written as it was read, whatever its order and its padding.
+/// written as it was read, whatever its order; an edit puts pad bytes where they were left out.
 class KT_EXPORT ListChunk {
 public:
     /// The items in their order, those too whose id says nothing to the reader.
@@ -43,6 +43,8 @@ protected:
     void erase(std::size_t index);
 
 private:
+    void settlePadding();
+
     FourCC form_;
     std::endian order_; // of its numbers
     std::vector<ListItem> items_;

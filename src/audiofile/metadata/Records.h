@@ -13,7 +13,7 @@ template <class T>
 void turnField(Packed<T>& field)
 {
     if constexpr (std::is_floating_point_v<T>)
-        field = std::bit_cast<T>(byteSwapped(std::bit_cast<std::uint32_t>(T{field})));
+        field = load<T>(&field, std::endian::native == std::endian::big ? std::endian::little : std::endian::big);
     else
         field.swap();
 }

@@ -2,6 +2,9 @@
 #include "audiofile/SoundFile.h"
 #include "audiofile/metadata/AIFFInstrumentChunk.h"
 #include "audiofile/metadata/AcidChunk.h"
+#include "audiofile/metadata/BroadcastExtension.h"
+#include "audiofile/metadata/CartChunk.h"
+#include "audiofile/metadata/CommentList.h"
 #include "audiofile/metadata/CueList.h"
 #include "audiofile/metadata/InfoList.h"
 #include "audiofile/metadata/MarkerList.h"
@@ -208,4 +211,52 @@ TEST(MetadataOfOtherPrograms, InfoOfFFmpeg)
     ASSERT_TRUE(info);
     EXPECT_EQ(info->find(fourCC("IART")), "An odd one");
     EXPECT_EQ(info->find(fourCC("INAM")), "Even");
+}
+
+TEST(MetadataOfOtherPrograms, BroadcastExtensionAndCartOfLibsndfile)
+{
+    SF_BROADCAST_INFO info{};
+    std::ranges::copy(std::string_view("The description"), info.description);
+    std::ranges::copy(std::string_view("2026-11-22"), info.origination_date);
+    info.time_reference_low = 5;
+    info.time_reference_high = 1;
+    info.version = 2;
+    info.loudness_value = -2310;
+    const TemporaryFolder folder;
+    const auto bext = BroadcastExtension::read(
+        chunkIn(soundWith(folder, SF_FORMAT_WAV, SFC_SET_BROADCAST_INFO, info), fourCC("bext")));
+    ASSERT_TRUE(bext);
+    EXPECT_EQ(bext->description.text(), "The description");
+    EXPECT_EQ(bext->originationDate.text(), "2026-11-22");
+    EXPECT_EQ(bext->timeReference(), 0x100000005u);
+    EXPECT_EQ(bext->loudnessValue, -2310);
+    ASSERT_FALSE(bext->codingHistoryLines().empty()); // libsndfile's own line
+    EXPECT_TRUE(bext->codingHistoryLines()[0].starts_with("A=PCM,F=8000,W=16,M=mono"));
+
+    SF_CART_INFO told{};
+    std::ranges::copy(std::string_view("0101"), told.version);
+    std::ranges::copy(std::string_view("A title"), told.title);
+    std::ranges::copy(std::string_view("https://example.org/"), told.url);
+    told.level_reference = -32768;
+    std::ranges::copy(std::string_view("SEG1"), told.post_timers[1].usage);
+    told.post_timers[1].value = 77;
+    const auto cart =
+        CartChunk::read(chunkIn(soundWith(folder, SF_FORMAT_WAV, SFC_SET_CART_INFO, told), fourCC("cart")));
+    ASSERT_TRUE(cart);
+    EXPECT_EQ(cart->version.text(), "0101");
+    EXPECT_EQ(cart->title.text(), "A title");
+    EXPECT_EQ(cart->url.text(), "https://example.org/");
+    EXPECT_EQ(cart->levelReference, -32768);
+    EXPECT_EQ(cart->postTimers[1].usage, fourCC("SEG1"));
+    EXPECT_EQ(cart->postTimers[1].value, 77u);
+}
+
+TEST(MetadataOfOtherPrograms, CommentsOfSox)
+{
+    const TemporaryFolder folder;
+    ASSERT_TRUE(runs(folder, "sox -n -r 8000 -c 1 -b 16 --comment 'An odd one' out.aiff trim 0 0.01"));
+    const auto list = CommentList::read(chunkIn(folder / "out.aiff", fourCC("COMT")));
+    ASSERT_TRUE(list && list->comments.size() == 1);
+    EXPECT_EQ(list->comments[0].text, "An odd one");
+    EXPECT_TRUE(list->behind.empty());
 }

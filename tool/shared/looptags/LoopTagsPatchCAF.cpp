@@ -2,7 +2,7 @@
 #include "loops/VireoLoopCombinedTagsChunkDataTypes.h"
 #include "loops/VireoLoopTerms.h"
 #include "media/containers/ContainerHeaders.h"
-#include "tool/shared/looptags/CAFTextPairs.h"
+#include "audiofile/metadata/CAFTextPairs.h"
 #include "tool/shared/looptags/LoopTagsLayouts.h"
 
 #include <fmt/format.h>

@@ -1,4 +1,4 @@
-#include "tool/shared/looptags/CAFTextPairs.h"
+#include "audiofile/metadata/CAFTextPairs.h"
 
 #include "loops/tagging/CAFPayloads.h"
 #include "platform/core/ByteWriter.h"

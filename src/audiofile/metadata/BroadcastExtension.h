@@ -1,0 +1,63 @@
+// The chunk "bext" of WAVE files: who recorded what, and when. Page: docs/formats/wave-metadata.md.
+#pragma once
+
+#include "audiofile/metadata/FixedText.h"
+#include "audiofile/metadata/Records.h"
+#include "platform/core/Export.h"
+
+#include <cstddef>
+
+/// These members, top to bottom, are the first 602 bytes of "bext". Texts are ASCII by the source.
+struct BroadcastFields {
+    static constexpr std::int16_t kNoLoudness = 0x7FFF; // of the five values of loudness
+
+    FixedText<256> description;                //   0
+    FixedText<32> originator;                  // 256
+    FixedText<32> originatorReference;         // 288
+    FixedText<10> originationDate;             // 320  yyyy-mm-dd; other separators stand there too
+    FixedText<8> originationTime;              // 330  hh:mm:ss
+    Packed<std::uint32_t> timeReferenceLow;    // 338  see BroadcastExtension::timeReference
+    Packed<std::uint32_t> timeReferenceHigh;   // 342
+    Packed<std::uint16_t> version;             // 346  0 to 2
+    std::array<std::byte, 64> umid{};          // 348  SMPTE ST 330, from version 1 on; of 32 bytes, zeros follow
+    Packed<std::int16_t> loudnessValue;        // 412  integrated, 1/100 LUFS; this and the next four from version 2 on
+    Packed<std::int16_t> loudnessRange;        // 414  1/100 LU
+    Packed<std::int16_t> maxTruePeakLevel;     // 416  1/100 dBTP
+    Packed<std::int16_t> maxMomentaryLoudness; // 418  1/100 LUFS
+    Packed<std::int16_t> maxShortTermLoudness; // 420  1/100 LUFS
+    std::array<std::byte, 180> reserved{};     // 422
+
+    void byteOrder(std::endian order)
+    {
+        turnFields(order, timeReferenceLow, timeReferenceHigh, version, loudnessValue, loudnessRange, maxTruePeakLevel,
+                   maxMomentaryLoudness, maxShortTermLoudness);
+    }
+    friend bool operator==(const BroadcastFields&, const BroadcastFields&) = default;
+};
+static_assert(sizeof(BroadcastFields) == 602 && offsetof(BroadcastFields, timeReferenceLow) == 338 &&
+              offsetof(BroadcastFields, umid) == 348 && offsetof(BroadcastFields, reserved) == 422);
+
+/// Published source: EBU Tech 3285, versions 0 to 2.
+struct KT_EXPORT BroadcastExtension : BroadcastFields {
+    /// None of fewer than 602 bytes. Of RIFX the order is big.
+    static std::optional<BroadcastExtension> read(BytesView body, std::endian order = std::endian::little);
+    Bytes write(std::endian order = std::endian::little) const;
+
+    /// The first frame's distance from midnight, in frames.
+    std::uint64_t timeReference() const
+    {
+        return std::uint64_t{timeReferenceHigh} << 32 | std::uint64_t{timeReferenceLow};
+    }
+    void setTimeReference(std::uint64_t frames)
+    {
+        timeReferenceLow = static_cast<std::uint32_t>(frames);
+        timeReferenceHigh = static_cast<std::uint32_t>(frames >> 32);
+    }
+    bool hasUMID() const { return version >= 1 && umid != decltype(umid){}; }
+    bool hasLoudness() const { return version >= 2; }
+    /// The history's lines that are not empty, up to a NUL, the first coding first ("A=PCM,F=48000,W=24,M=stereo").
+    std::vector<std::string> codingHistoryLines() const;
+    friend bool operator==(const BroadcastExtension&, const BroadcastExtension&) = default;
+
+    Bytes codingHistory; // what follows the 602 bytes: lines that end with CR LF
+};

@@ -2,6 +2,7 @@
 #pragma once
 
 #include "audiofile/AudioFileInfo.h"
+#include "platform/core/Bytes.h"
 #include "platform/core/Export.h"
 #include "platform/core/FourCC.h"
 
@@ -20,3 +21,8 @@ inline constexpr std::size_t kMaxAudioFileHeaderSize = 4096;
 /// and makes it RF64 once it has.
 KT_EXPORT long BuildAudioFileHeader(void* buffer, FourCC fileType, long long frames, long long sampleRate, int channels,
                                     int bits, TAudioBusFormat busFormat, bool option);
+
+/// The same header, of any length, with further chunks ahead of the samples: `chunks` are whole, with headers and pad
+/// bytes. Empty where BuildAudioFileHeader gives 0.
+KT_EXPORT Bytes MakeAudioFileHeader(FourCC fileType, long long frames, long long sampleRate, int channels, int bits,
+                                    TAudioBusFormat busFormat, bool option, Bytes chunks);

@@ -1,5 +1,6 @@
 #include "tool/decode/DecodeFile.h"
 
+#include "tool/decode/DecodeMetadata.h"
 #include "tool/shared/access/FileAccess.h"
 #include "tool/shared/edits/OutputFile.h"
 #include "tool/shared/output/Failure.h"
@@ -130,14 +131,26 @@ DecodeResult decodeFile(const DecodeJob& job, const DecodeOptions& options)
     FileAccess access = accessForReading(job.file, {.quiet = options.quiet});
     DecodeSource source(job.file, options.wishes);
     DecodeTags tags(job.file);
-    const DecodeFrame frame(source.sound(), *options.wishes.format);
+    Target target(job, options.force);
+    const DecodedSound& sound = source.sound();
+    const DecodeFormat& format = *options.wishes.format;
+    const bool tagsFollow =
+        target.regular() != nullptr && tags.carriesTexts(DecodeFrame(sound, format).container(), source.isWhole());
+    KeptMetadata kept = DecodeMetadata(job.file).keptIn(format.fileType,
+                                                        {source.sourceRate(), sound.sampleRate, source.start(),
+                                                         static_cast<std::uint64_t>(sound.frames), source.isWhole()},
+                                                        sound, tagsFollow);
+    tags.forget(kept.sourceIds);
+    if (kept.hasTexts && !tagsFollow)
+        tags.forgetTexts();
+    const DecodeFrame frame(sound, format, std::move(kept.chunks));
     DecodeResult result{.output = job.output,
                         .container = frame.container(),
-                        .sound = source.sound(),
+                        .sound = sound,
                         .clippedSamples = 0,
                         .missingFrames = 0,
-                        .tags = {}};
-    Target target(job, options.force);
+                        .tags = {},
+                        .kept = std::move(kept.names)};
     writeSound(source, frame, target, options.showsProgress, result);
     access.reset(); // ahead of the wait for others who have the output
     if (target.failed())
@@ -148,6 +161,7 @@ DecodeResult decodeFile(const DecodeJob& job, const DecodeOptions& options)
     result.tags =
         tags.carryTo(target.regular() != nullptr ? target.regular()->path() : "", result.container, result.sound,
                      source.sourceRate(), source.isWhole() && result.sound.frames == source.sound().frames);
+    result.tags.notKept.insert(result.tags.notKept.end(), kept.notKept.begin(), kept.notKept.end());
     target.finish(options.quiet);
     result.notes = notesOn(source, result);
     return result;

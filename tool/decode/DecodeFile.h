@@ -27,6 +27,7 @@ struct DecodeResult {
     std::int64_t clippedSamples = 0;
     std::uint64_t missingFrames = 0; // as DecodeSource::missingFrames
     CarriedTags tags;
+    std::vector<std::string> kept = {};  // as KeptMetadata::names
     std::vector<std::string> notes = {}; // what is not as people may expect, in words
 };
 

@@ -64,17 +64,18 @@ platform::StreamDescription streamOf(const DecodedSound& sound, const DecodeForm
                                                    .order = isBig ? std::endian::big : std::endian::little});
 }
 
-DecodeFrame::DecodeFrame(const DecodedSound& sound, const DecodeFormat& format)
+DecodeFrame::DecodeFrame(const DecodedSound& sound, const DecodeFormat& format, Bytes chunks)
     : sound_(sound),
-      fileType_(format.fileType)
+      fileType_(format.fileType),
+      chunks_(std::move(chunks))
 {
     if (sound.frames > std::numeric_limits<std::int64_t>::max() / sound.bytesPerFrame())
         throw Failure("has too much sound for any file");
     if (fileType_ == 0)
         return;
-    reservesRoom_ =
-        fileType_ == kWAVE && sound.bytes() > MaxAudioFileSize(kWAVE, false) - std::int64_t{kMaxAudioFileHeaderSize};
-    if (sound.bytes() > MaxAudioFileSize(fileType_, true) - std::int64_t{kMaxAudioFileHeaderSize})
+    const std::int64_t ahead = std::int64_t{kMaxAudioFileHeaderSize} + std::ssize(chunks_);
+    reservesRoom_ = fileType_ == kWAVE && sound.bytes() > MaxAudioFileSize(kWAVE, false) - ahead;
+    if (sound.bytes() > MaxAudioFileSize(fileType_, true) - ahead)
         throw Failure(fmt::format("has too much sound for {} file, {} bytes", nameOf(fileType_), sound.bytes()));
     if (header(sound.frames).empty())
         throw Failure(fmt::format("{} file does not hold {} channels of {} at {:.10g} Hz", nameOf(fileType_),
@@ -85,12 +86,11 @@ std::string DecodeFrame::header(std::int64_t frames) const
 {
     if (fileType_ == 0)
         return {};
-    std::string header(kMaxAudioFileHeaderSize, '\0');
     const int bits = sound_.depth.isFloat && sound_.depth.bits == 32 ? -32 : sound_.depth.bits;
-    const long size = BuildAudioFileHeader(header.data(), fileType_, frames, std::llround(sound_.sampleRate),
-                                           static_cast<int>(sound_.channels), bits, sound_.busFormat, reservesRoom_);
-    header.resize(static_cast<std::size_t>(std::max(size, 0L)));
-    return header;
+    const Bytes header =
+        MakeAudioFileHeader(fileType_, frames, std::llround(sound_.sampleRate), static_cast<int>(sound_.channels), bits,
+                            sound_.busFormat, reservesRoom_, chunks_);
+    return std::string(textOf(header));
 }
 
 std::string DecodeFrame::trailer(std::int64_t frames) const

@@ -48,8 +48,8 @@ platform::StreamDescription streamOf(const DecodedSound& sound, const DecodeForm
 /// the output need not be gone back to; when fewer came after all, `of` them is as long.
 class DecodeFrame {
 public:
-    /// Throws Failure when the format cannot hold such a sound.
-    DecodeFrame(const DecodedSound& sound, const DecodeFormat& format);
+    /// `chunks` go ahead of the samples, whole. Throws Failure when the format cannot hold such a sound.
+    DecodeFrame(const DecodedSound& sound, const DecodeFormat& format, Bytes chunks = {});
 
     std::string header(std::int64_t frames) const;
     /// A pad byte where the container wants one.
@@ -60,5 +60,6 @@ public:
 private:
     DecodedSound sound_;
     FourCC fileType_;
+    Bytes chunks_;
     bool reservesRoom_ = false; // to be RF64, which a WAVE file of more than 4 GiB is
 };

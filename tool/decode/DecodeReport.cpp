@@ -19,6 +19,15 @@ std::string soundText(const DecodeResult& result)
                        depthText(sound.depth), channels);
 }
 
+/// What was carried over.
+std::string withText(const DecodeResult& result)
+{
+    std::vector<std::string> parts = result.kept;
+    if (!result.tags.keys.empty())
+        parts.emplace_back("its tags");
+    return parts.empty() ? "" : fmt::format(", with {}", fmt::join(parts, ", "));
+}
+
 void writeJson(JsonWriter& json, const std::string& path, const DecodeResult& result)
 {
     const DecodedSound& sound = result.sound;
@@ -36,6 +45,8 @@ void writeJson(JsonWriter& json, const std::string& path, const DecodeResult& re
     json.member("clippedSamples", result.clippedSamples);
     json.member("missingFrames", result.missingFrames);
     json.member("tags", result.tags.keys);
+    if (!result.kept.empty())
+        json.member("kept", result.kept);
     if (!result.tags.notKept.empty())
         json.member("notKept", result.tags.notKept);
     json.endObject();
@@ -50,7 +61,7 @@ void DecodeReport::add(const std::string& path, const DecodeResult& result)
         json_.end();
     } else if (form_ != Form::none)
         output_.print("{}: decoded to {}, {}{}\n", printable(path), printable(result.output), soundText(result),
-                      result.tags.keys.empty() ? "" : ", with its tags");
+                      withText(result));
     if (form_ == Form::table)
         output_.flush(); // the next file may take its time
     if (quiet_ || result.notes.empty())

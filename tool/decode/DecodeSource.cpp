@@ -103,7 +103,7 @@ void DecodeSource::lookInto(const std::string& path)
 void DecodeSource::setRange(const DecodeWishes& wishes)
 {
     const std::uint64_t all = std::min(reader_->clientFrameCount(), static_cast<std::uint64_t>(kMostFrames));
-    const std::uint64_t start = wishes.start.at(sound_.sampleRate);
+    const std::uint64_t start = start_ = wishes.start.at(sound_.sampleRate);
     if (start > 0 && start >= all)
         throw Failure(fmt::format("has {} frames, and none at {}", all, start));
     const std::uint64_t end = wishes.end ? wishes.end->at(sound_.sampleRate) : all;

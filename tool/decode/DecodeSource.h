@@ -32,6 +32,8 @@ public:
     /// Of the output, which has as many frames unless the file ends ahead of what it promises.
     const DecodedSound& sound() const { return sound_; }
     bool isWhole() const { return isWhole_; }
+    /// Of FILE's frames at the output's rate, the first of the output.
+    std::uint64_t start() const { return start_; }
     /// How many frames become one second, there and here.
     double sourceRate() const { return sourceRate_; }
     /// What is not as it was asked for, in words.
@@ -61,6 +63,7 @@ private:
     double sourceRate_ = 0;
     bool isWhole_ = true;
     std::vector<std::string> notes_;
+    std::uint64_t start_ = 0;
     std::int64_t left_ = 0; // frames
     std::uint32_t blockFrames_ = 0;
     std::vector<std::byte> block_;

@@ -122,6 +122,26 @@ DecodeTags::DecodeTags(const std::string& path)
         source_.reset();
 }
 
+void DecodeTags::forget(std::span<const FourCC> ids)
+{
+    for (const FourCC id : ids) {
+        std::erase(others_, nameOf(id));
+        if (id == fourCC("info"))
+            std::erase(others_, "the rest of info");
+    }
+}
+
+void DecodeTags::forgetTexts()
+{
+    if (source_ && !source_->tags.isLoop())
+        source_.reset();
+}
+
+bool DecodeTags::carriesTexts(const std::string& container, bool isWhole) const
+{
+    return problem_.empty() && source_ != nullptr && isWhole && (container == "AIFF" || container == "CAF");
+}
+
 CarriedTags DecodeTags::carryTo(const std::string& output, const std::string& container, const DecodedSound& sound,
                                 double sourceRate, bool isWhole)
 {

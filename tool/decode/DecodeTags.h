@@ -5,6 +5,7 @@
 #include "tool/shared/looptags/LoopTagsCopy.h"
 
 #include <memory>
+#include <span>
 #include <string>
 #include <vector>
 
@@ -18,6 +19,13 @@ struct CarriedTags {
 class DecodeTags {
 public:
     explicit DecodeTags(const std::string& path);
+
+    /// That chunks of these ids are not told of: others carry them over.
+    void forget(std::span<const FourCC> ids);
+    /// The same of texts about the file, when it is no loop.
+    void forgetTexts();
+    /// Whether carryTo will put the texts about the file (title, artist and so on) into the output.
+    bool carriesTexts(const std::string& container, bool isWhole) const;
 
     /// Puts them into the decoded file, the transients at the frames that they have at another rate; `isWhole` tells
     /// whether all of the sound is there, for what the tags say is true of all of it only. An empty path stands for an

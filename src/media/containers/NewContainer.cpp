@@ -117,6 +117,7 @@ Bytes headerOfWAVE(const NewContainer& file)
         if (file.hasReservation)
             writeReservation(out, isLong ? kDs64 : kJUNK, riffSize, file);
         writeFormatChunk(out, file);
+        out.write(file.chunks);
         fillUp(out, file, sizeof(ChkHeader));
         out.writeFourCC(kData);
         out.write(isLong ? static_cast<std::uint32_t>(kMost32) : static_cast<std::uint32_t>(dataSizeOf(file)));
@@ -170,6 +171,7 @@ Bytes headerOfAIFF(const NewContainer& file)
     if (isAIFC)
         writeCompression(out, file);
     out.patch(commonSizeAt, static_cast<std::uint32_t>(out.size() - commonSizeAt - sizeof(std::uint32_t)));
+    out.write(file.chunks);
     fillUp(out, file, sizeof(ChkHeader) + soundDataFixedSize);
     out.writeFourCC(fourCC("SSND"));
     out.write(static_cast<std::uint32_t>(std::min(dataSizeOf(file), kMostSigned) + soundDataFixedSize));
@@ -209,6 +211,7 @@ Bytes headerOfCAF(const NewContainer& file)
         out.write(speakers);
         out.write<std::uint32_t>(0); // no further descriptions
     }
+    out.write(file.chunks);
     fillUp(out, file, sizeof(CAFChunkHeader) + editCountSize);
     out.writeFourCC(kData);
     out.write(dataSizeOf(file) + editCountSize);

@@ -21,6 +21,7 @@ struct NewContainer {
     std::uint64_t frames = 0; // that will follow
     bool isCounted = true; // in a "fact" where the format asks for one; whoever adds frames later cannot keep it true
     bool hasReservation = false; // of WAVE: room ("JUNK") to grow past 4 GiB; makes it RF64 once it has
+    Bytes chunks = {};           // ahead of the samples: whole ones, with headers and pad bytes
     std::size_t dataOffset = 0;  // filler makes the samples begin here; 0 for none
 };
 

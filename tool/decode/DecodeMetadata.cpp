@@ -1,0 +1,330 @@
+#include "tool/decode/DecodeMetadata.h"
+
+#include "audiofile/CAudioFileIO.h"
+#include "loops/tagging/CAFPayloads.h"
+#include "platform/core/ByteWriter.h"
+#include "tool/decode/PortableMarkers.h"
+#include "tool/shared/input/InputFile.h"
+#include "tool/shared/looptags/LoopTagFields.h"
+
+#include <fmt/format.h>
+
+#include <algorithm>
+#include <array>
+
+using platform::ContainerKind;
+
+namespace {
+
+constexpr FourCC kBext = fourCC("bext"), kIXML = fourCC("iXML"), kAxml = fourCC("axml"), kChna = fourCC("chna"),
+                 kCue = fourCC("cue "), kList = fourCC("LIST"), kMark = fourCC("MARK"), kComments = fourCC("COMT"),
+                 kCAFInfo = fourCC("info"), kCAFMarkers = fourCC("mark"), kCAFTexts = fourCC("strg");
+constexpr std::array kOfWAVE{kBext, kIXML, kAxml, kChna, kCue, kList};
+constexpr std::array kOfAIFF{kMark, kComments, fourCC("NAME"), fourCC("AUTH"), fourCC("(c) "), fourCC("ANNO")};
+constexpr std::array kOfCAF{kCAFInfo, kCAFMarkers, kCAFTexts};
+constexpr std::array<std::string_view, 7> kOfTexts{"INFO", "info", "NAME", "AUTH", "(c)", "ANNO", "COMT"};
+/// More than people write; it is held in memory.
+constexpr std::int64_t kMostBytes = 256 << 20;
+
+FourCC formOf(const HeldChunk& chunk)
+{
+    return chunk.id == kList && chunk.body.size() >= sizeof(FourCC) ? loadBE<FourCC>(chunk.body.data()) : 0;
+}
+
+std::string nameOf(const HeldChunk& chunk)
+{
+    const std::string text = fourCCText(formOf(chunk) != 0 ? formOf(chunk) : chunk.id);
+    return text.substr(0, text.find_last_not_of(' ') + 1);
+}
+
+bool isTagText(std::string_view key)
+{
+    return std::ranges::any_of(tagFields(),
+                               [key](const TagField& field) { return field.isFileInfo && field.name == key; });
+}
+
+void write(ByteWriter& out, const HeldChunk& chunk, FourCC fileType)
+{
+    out.writeFourCC(chunk.id);
+    if (fileType == kCaff)
+        out.write(std::int64_t{std::ssize(chunk.body)});
+    else
+        out.write(static_cast<std::uint32_t>(chunk.body.size()));
+    out.write(chunk.body);
+    if (fileType != kCaff)
+        out.writeZeros(chunk.body.size() & 1);
+}
+
+} // namespace
+
+DecodeMetadata::DecodeMetadata(const std::string& path)
+{
+    CAudioFileIO file;
+    if (file.OpenForChunks(referenceTo(path), 0) != kStatusOK || !file.HasChunks())
+        return;
+    bits_ = file.Info().bitsPerSample;
+    channels_ = file.Info().channels;
+    isFloat_ = file.Info().floatingPoint;
+    isLinearPCM_ = file.Info().IsLinearPCM();
+    ContainerExtent extent;
+    std::span<const FourCC> ids;
+    const auto visit = [&](const ChunkEntry& chunk) {
+        const ContainerKind kind = extent.kind;
+        family_ = kind == ContainerKind::iff    ? Family::aiff
+                  : kind == ContainerKind::caf  ? Family::caf
+                  : kind == ContainerKind::rex2 ? Family::none
+                                                : Family::wave;
+        order_ = kind == ContainerKind::rifx ? std::endian::big : std::endian::little;
+        ids = family_ == Family::wave   ? std::span<const FourCC>(kOfWAVE)
+              : family_ == Family::aiff ? std::span<const FourCC>(kOfAIFF)
+              : family_ == Family::caf  ? std::span<const FourCC>(kOfCAF)
+                                        : std::span<const FourCC>();
+        const bool isThere = chunk.size >= 0 && chunk.size <= std::min(extent.fileLength - chunk.body, kMostBytes);
+        if (!isThere || std::ranges::find(ids, chunk.id) == ids.end())
+            return true;
+        HeldChunk held{chunk.id, Bytes(static_cast<std::size_t>(chunk.size))};
+        if (held.body.empty() ||
+            file.Read(held.body.data(), chunk.body, static_cast<long>(chunk.size), nullptr) == kStatusOK)
+            chunks_.push_back(std::move(held));
+        return true;
+    };
+    file.ForEachChunk(visit, &extent);
+}
+
+/// One output in the making.
+class DecodeMetadata::Keeper {
+public:
+    Keeper(const DecodeMetadata& source, FourCC fileType, const BroadcastChange& changed, bool tagsFollow)
+        : source_(source),
+          fileType_(fileType),
+          changed_(changed),
+          tagsFollow_(tagsFollow),
+          cues_(changed.change, source.order_)
+    {
+    }
+
+    KeptMetadata run()
+    {
+        const Family target = fileType_ == kWAVE   ? Family::wave
+                              : fileType_ == kAIFF ? Family::aiff
+                              : fileType_ == kCaff ? Family::caf
+                                                   : Family::none;
+        if (target == Family::none || source_.family_ == Family::none)
+            return {};
+        if (target == source_.family_)
+            copy();
+        else
+            translate();
+        if (dropped_ > 0)
+            kept_.notKept.push_back(
+                fmt::format("{} of its markers {} cut off", dropped_, dropped_ == 1 ? "is" : "are"));
+        return finish();
+    }
+
+private:
+    const SoundChange& change() const { return changed_.change; }
+
+    void keep(FourCC sourceId, HeldChunk chunk)
+    {
+        told(sourceId);
+        if (chunk.body.empty())
+            return;
+        const std::string name = nameOf(chunk);
+        if (std::ranges::find(kept_.names, name) == kept_.names.end())
+            kept_.names.push_back(name);
+        kept_.hasTexts = kept_.hasTexts || std::ranges::find(kOfTexts, name) != kOfTexts.end();
+        chunks_.push_back(std::move(chunk));
+    }
+    void told(FourCC sourceId) { kept_.sourceIds.push_back(sourceId); }
+
+    /// To a file of the same kind: the same chunks in their order.
+    void copy()
+    {
+        // Labels of points that are gone go too, wherever they stand.
+        std::vector<Bytes> cues;
+        for (const HeldChunk& chunk : source_.chunks_)
+            if (chunk.id == kCue && source_.family_ == Family::wave)
+                cues.push_back(cues_.movedCues(chunk.body));
+        dropped_ += cues_.dropped();
+        std::size_t nextCue = 0;
+        bool leavesList = false;
+        for (const HeldChunk& chunk : source_.chunks_) {
+            const BytesView body = chunk.body;
+            if (chunk.id == kBext)
+                keep(kBext, {kBext, changedBroadcastExtension(body, source_.order_, changed_)});
+            else if (chunk.id == kIXML)
+                keep(kIXML, {kIXML, changedIXML(body, changed_, kept_.notKept)});
+            else if (chunk.id == kAxml || chunk.id == kChna)
+                copyADM(chunk);
+            else if (chunk.id == kCue)
+                keep(kCue, {kCue, std::move(cues[nextCue++])});
+            else if (chunk.id == kList)
+                leavesList = !copyList(chunk) || leavesList;
+            else if (chunk.id == kMark)
+                keep(kMark, {kMark, movedMarks(body, change(), dropped_)});
+            else if (chunk.id == kCAFMarkers)
+                keep(kCAFMarkers, {kCAFMarkers, movedCAFMarkers(body, change(), dropped_)});
+            else if (chunk.id == kCAFInfo)
+                copyCAFInfo(chunk);
+            else if (chunk.id == kCAFTexts || chunk.id == fourCC("ANNO") || !tagsFollow_)
+                keep(chunk.id, chunk);
+        }
+        if (leavesList)
+            std::erase(kept_.sourceIds, kList);
+    }
+
+    /// Of another part, or of other channels, an ADM document is not true.
+    void copyADM(const HeldChunk& chunk)
+    {
+        if (!change().isWhole || !changed_.keepsChannels)
+            return;
+        keep(chunk.id, chunk);
+        const bool saysRates = chunk.id == kAxml && textOf(chunk.body).find("sampleRate=") != std::string_view::npos;
+        if (saysRates && changed_.isRecoded)
+            kept_.notKept.emplace_back("axml still has the sample rates and bit depths of the file");
+    }
+
+    bool copyList(const HeldChunk& chunk)
+    {
+        const FourCC form = formOf(chunk);
+        if (form == fourCC("adtl")) {
+            keep(kList, {kList, cues_.movedLabels(chunk.body)});
+        } else if (form == fourCC("INFO") && source_.order_ == std::endian::little) {
+            keep(kList, chunk);
+        } else if (form == fourCC("INFO")) {
+            PortableTexts texts;
+            texts.addFromWAVE(chunk.body, source_.order_);
+            keepTexts(kList, texts);
+        } else {
+            return false;
+        }
+        return true;
+    }
+
+    void copyCAFInfo(const HeldChunk& chunk)
+    {
+        tagging::StringPairs pairs;
+        tagging::ForEachCAFInfoString(chunk.body, [&](std::string_view key, std::string_view text) {
+            if (!isOfOneCoding(key) && !(tagsFollow_ && isTagText(key)))
+                pairs.emplace(key, text);
+        });
+        told(kCAFInfo);
+        if (auto info = pairs.empty() ? std::nullopt : CAFInfoStringsData(pairs))
+            keep(kCAFInfo, {kCAFInfo, std::move(*info)});
+    }
+
+    /// To a file of another kind: what that has a place for.
+    void translate()
+    {
+        PortableTexts texts;
+        PortableMarkers markers;
+        if (source_.family_ == Family::wave)
+            readWAVE(texts, markers);
+        else if (source_.family_ == Family::aiff)
+            readAIFF(texts, markers);
+        else
+            readCAF(texts, markers);
+        keepTexts(0, texts);
+        dropped_ += markers.move(change());
+        std::size_t left = 0;
+        for (HeldChunk& chunk : markers.chunksFor(fileType_, left))
+            keep(0, std::move(chunk));
+        if (left > 0)
+            kept_.notKept.push_back(fmt::format("{} of its markers have no room there", left));
+        if (markers.hasMore)
+            kept_.notKept.emplace_back("of its markers only places and names are kept");
+    }
+
+    void readWAVE(PortableTexts& texts, PortableMarkers& markers)
+    {
+        std::vector<BytesView> lists;
+        bool leavesList = false;
+        for (const HeldChunk& chunk : source_.chunks_)
+            if (chunk.id == kList) {
+                const FourCC form = formOf(chunk);
+                texts.addFromWAVE(chunk.body, source_.order_);
+                if (form == fourCC("adtl"))
+                    lists.push_back(chunk.body);
+                leavesList = leavesList || (form != fourCC("adtl") && form != fourCC("INFO"));
+            }
+        for (const HeldChunk& chunk : source_.chunks_)
+            if (chunk.id == kCue) {
+                markers.addFromWAVE(chunk.body, lists, source_.order_);
+                told(kCue);
+            }
+        if (!leavesList)
+            told(kList);
+    }
+
+    void readAIFF(PortableTexts& texts, PortableMarkers& markers)
+    {
+        for (const HeldChunk& chunk : source_.chunks_) {
+            if (chunk.id == kMark)
+                markers.addFromAIFF(chunk.body);
+            else if (chunk.id == fourCC("ANNO") || !tagsFollow_)
+                texts.addFromAIFF(chunk.id, chunk.body);
+            told(chunk.id);
+        }
+        for (const HeldChunk& chunk : source_.chunks_)
+            if (chunk.id == kComments && !tagsFollow_)
+                markers.hasMore = texts.addComments(chunk.body) || markers.hasMore;
+    }
+
+    void readCAF(PortableTexts& texts, PortableMarkers& markers)
+    {
+        BytesView names;
+        for (const HeldChunk& chunk : source_.chunks_) {
+            if (chunk.id == kCAFTexts)
+                names = chunk.body;
+            else if (chunk.id == kCAFInfo)
+                texts.addFromCAF(chunk.body);
+            told(chunk.id);
+        }
+        if (tagsFollow_)
+            std::erase_if(texts.texts, [](const auto& each) { return isTagText(each.first); });
+        for (const HeldChunk& chunk : source_.chunks_)
+            if (chunk.id == kCAFMarkers)
+                markers.addFromCAF(chunk.body, names);
+    }
+
+    void keepTexts(FourCC sourceId, const PortableTexts& texts)
+    {
+        std::vector<std::string> left = texts.others;
+        for (HeldChunk& chunk : texts.chunksFor(fileType_, left))
+            keep(sourceId, std::move(chunk));
+        if (left.size() > kMostNamed)
+            left.resize(kMostNamed);
+        if (!left.empty())
+            kept_.notKept.push_back(fmt::format("of its texts {} {} not carried over", fmt::join(left, ", "),
+                                                left.size() == 1 ? "is" : "are"));
+    }
+
+    KeptMetadata finish()
+    {
+        ByteWriter out(fileType_ == kWAVE ? std::endian::little : std::endian::big);
+        for (const HeldChunk& chunk : chunks_)
+            write(out, chunk, fileType_);
+        kept_.chunks = out.take();
+        return std::move(kept_);
+    }
+
+    static constexpr std::size_t kMostNamed = 12;
+
+    const DecodeMetadata& source_;
+    FourCC fileType_;
+    BroadcastChange changed_;
+    bool tagsFollow_;
+    CueMove cues_;
+    std::size_t dropped_ = 0;
+    std::vector<HeldChunk> chunks_;
+    KeptMetadata kept_;
+};
+
+KeptMetadata DecodeMetadata::keptIn(FourCC fileType, SoundChange change, const DecodedSound& sound,
+                                    bool tagsFollow) const
+{
+    const bool keepsChannels = channels_ == static_cast<int>(sound.channels);
+    const bool keepsCoding = isLinearPCM_ && keepsChannels && change.keepsRate() && bits_ == sound.depth.bits &&
+                             isFloat_ == sound.depth.isFloat;
+    return Keeper(*this, fileType, {change, sound, !keepsCoding, keepsChannels}, tagsFollow).run();
+}

@@ -1,0 +1,238 @@
+#include "tool/decode/PortableMarkers.h"
+
+#include "audiofile/metadata/AssociatedDataList.h"
+#include "audiofile/metadata/CAFMarkers.h"
+#include "audiofile/metadata/CAFStringTable.h"
+#include "audiofile/metadata/CueList.h"
+#include "audiofile/metadata/MarkerList.h"
+#include "media/containers/ContainerHeaders.h"
+
+#include <algorithm>
+#include <limits>
+#include <set>
+
+namespace {
+
+constexpr std::uint64_t kMost32 = std::numeric_limits<std::uint32_t>::max();
+
+/// None for a place that was cut off, or that no field can say.
+std::optional<std::uint32_t> place32(const SoundChange& change, std::uint32_t frame)
+{
+    const auto place = change.placeOf(frame);
+    return place && *place <= kMost32 ? std::optional(static_cast<std::uint32_t>(*place)) : std::nullopt;
+}
+
+/// All bytes set.
+const CAFTimecode kNoTimecode = [] {
+    CAFTimecode none;
+    none.hours = none.minutes = none.seconds = none.frames = std::int8_t{-1};
+    none.subFrameSampleOffset = std::uint32_t{0xFFFFFFFF};
+    return none;
+}();
+
+} // namespace
+
+Bytes CueMove::movedCues(BytesView body)
+{
+    auto cues = CueList::read(body, order_);
+    if (!cues || (change_.keepsPlaces() && order_ == std::endian::little))
+        return {body.begin(), body.end()};
+    std::vector<CuePoint> kept;
+    for (CuePoint point : cues->points) {
+        const std::uint32_t frame = point.sampleOffset;
+        const auto place = place32(change_, frame);
+        if (!place) {
+            dropped_.push_back(point.id);
+            continue;
+        }
+        const std::uint32_t position = point.position;
+        point.position = position == frame ? *place : place32(change_, position).value_or(*place);
+        point.sampleOffset = *place;
+        point.blockStart = 0; // of other samples
+        kept.push_back(point);
+    }
+    cues->points = std::move(kept);
+    cues->missingPoints = 0;
+    cues->behind.clear();
+    return cues->points.empty() ? Bytes() : cues->write();
+}
+
+Bytes CueMove::movedLabels(BytesView body) const
+{
+    auto list = AssociatedDataList::read(body, order_);
+    if (!list || (change_.keepsPlaces() && order_ == std::endian::little))
+        return Bytes(body.begin(), body.end());
+    AssociatedDataList moved;
+    if (order_ != std::endian::little) { // items are numbers of the other order
+        for (const CueText& label : list->labels())
+            moved.setLabel(label.cueId, label.text);
+        for (const CueText& note : list->notes())
+            moved.setNote(note.cueId, note.text);
+        for (const CueRange& range : list->ranges())
+            moved.setRange(range);
+    } else {
+        moved = *list;
+    }
+    for (const std::uint32_t id : dropped_)
+        moved.eraseCue(id);
+    for (CueRange range : moved.ranges()) {
+        const std::uint64_t length = std::min(change_.scaled(range.sampleLength), change_.frames);
+        range.sampleLength = static_cast<std::uint32_t>(std::min(length, kMost32));
+        moved.setRange(range);
+    }
+    return moved.items().empty() ? Bytes() : moved.write();
+}
+
+void PortableMarkers::addFromWAVE(BytesView body, const std::vector<BytesView>& lists, std::endian order)
+{
+    const auto cues = CueList::read(body, order);
+    if (!cues)
+        return;
+    std::vector<AssociatedDataList> labels;
+    for (const BytesView list : lists)
+        if (auto read = AssociatedDataList::read(list, order))
+            labels.push_back(std::move(*read));
+    for (const CuePoint& point : cues->points) {
+        PortableMarker marker{point.id, point.sampleOffset, {}};
+        for (const AssociatedDataList& list : labels) {
+            const auto label = list.labelOf(marker.id), note = list.noteOf(marker.id);
+            if (marker.name.empty())
+                marker.name = textInUTF8(label.value_or(note.value_or("")), false);
+            hasMore = hasMore || (label && note);
+        }
+        markers.push_back(std::move(marker));
+    }
+    hasMore = hasMore || std::ranges::any_of(labels, [](const auto& list) { return !list.ranges().empty(); });
+}
+
+void PortableMarkers::addFromAIFF(BytesView body)
+{
+    if (const auto list = MarkerList::read(body))
+        for (const AIFFMarker& marker : list->markers)
+            markers.push_back({static_cast<std::uint32_t>(marker.id), marker.position, textInUTF8(marker.name, true)});
+}
+
+void PortableMarkers::addFromCAF(BytesView body, BytesView texts)
+{
+    const auto list = CAFMarkerList::read(body);
+    const auto names = CAFStringTable::read(texts);
+    if (!list)
+        return;
+    for (const CAFMarker& marker : list->markers) {
+        const double frame = marker.framePosition;
+        if (!(frame >= 0 && frame <= 9e18))
+            continue;
+        const std::uint32_t id = marker.id;
+        markers.push_back({id, static_cast<std::uint64_t>(std::round(frame)),
+                           textInUTF8(names ? names->find(id).value_or("") : "", false)});
+        hasMore = hasMore || FourCC{marker.type} != 0 || std::uint32_t{marker.channel} != 0;
+    }
+}
+
+std::size_t PortableMarkers::move(const SoundChange& change)
+{
+    std::vector<PortableMarker> kept;
+    for (PortableMarker marker : markers)
+        if (const auto place = change.placeOf(marker.frame)) {
+            marker.frame = *place;
+            kept.push_back(std::move(marker));
+        }
+    const std::size_t dropped = markers.size() - kept.size();
+    markers = std::move(kept);
+    return dropped;
+}
+
+std::vector<HeldChunk> PortableMarkers::chunksFor(FourCC fileType, std::size_t& left) const
+{
+    CueList cues;
+    AssociatedDataList labels;
+    MarkerList marks;
+    CAFMarkerList cafMarks;
+    CAFStringTable names;
+    std::set<std::uint32_t> ids;
+    const bool isAIFF = fileType == kAIFF;
+    const std::uint32_t mostId = isAIFF ? 32767 : std::numeric_limits<std::uint32_t>::max();
+    for (const PortableMarker& marker : markers) {
+        const bool hasRoom = fileType == kCaff || (marker.frame <= kMost32 && (!isAIFF || ids.size() < mostId));
+        if (!hasRoom) {
+            ++left;
+            continue;
+        }
+        std::uint32_t id = marker.id;
+        if (id == 0 || id > mostId || ids.contains(id))
+            for (id = static_cast<std::uint32_t>(ids.size()) + 1; ids.contains(id) && id < mostId;)
+                ++id;
+        ids.insert(id);
+        const auto frame = static_cast<std::uint32_t>(marker.frame);
+        if (fileType == kWAVE) {
+            CuePoint& point = cues.points.emplace_back();
+            point.id = id;
+            point.position = point.sampleOffset = frame;
+            if (!marker.name.empty())
+                labels.setLabel(id, marker.name);
+        } else if (fileType == kCaff) {
+            CAFMarker& moved = cafMarks.markers.emplace_back();
+            moved.framePosition = static_cast<double>(marker.frame);
+            moved.id = id;
+            moved.timecode = kNoTimecode;
+            CAFStringEntry& entry = names.entries.emplace_back();
+            entry.id = id;
+            entry.offset = std::ssize(names.texts);
+            const Bytes text = textAndNUL(marker.name);
+            names.texts.insert(names.texts.end(), text.begin(), text.end());
+        } else {
+            marks.markers.push_back({.id = static_cast<std::int16_t>(id), .position = frame, .name = marker.name});
+        }
+    }
+    std::vector<HeldChunk> chunks;
+    if (!cues.points.empty())
+        chunks.push_back({fourCC("cue "), cues.write()});
+    if (!labels.items().empty())
+        chunks.push_back({fourCC("LIST"), labels.write()});
+    if (!marks.markers.empty())
+        chunks.push_back({fourCC("MARK"), marks.write()});
+    if (!cafMarks.markers.empty()) {
+        chunks.push_back({fourCC("strg"), names.write()});
+        chunks.push_back({fourCC("mark"), cafMarks.write()});
+    }
+    return chunks;
+}
+
+Bytes movedMarks(BytesView body, const SoundChange& change, std::size_t& dropped)
+{
+    auto marks = MarkerList::read(body);
+    if (!marks || change.keepsPlaces())
+        return Bytes(body.begin(), body.end());
+    std::vector<AIFFMarker> kept;
+    for (AIFFMarker& marker : marks->markers)
+        if (const auto place = place32(change, marker.position)) {
+            marker.position = *place;
+            kept.push_back(std::move(marker));
+        }
+    dropped += marks->markers.size() - kept.size();
+    marks->markers = std::move(kept);
+    marks->missingMarkers = 0;
+    marks->behind.clear();
+    return marks->markers.empty() ? Bytes() : marks->write();
+}
+
+Bytes movedCAFMarkers(BytesView body, const SoundChange& change, std::size_t& dropped)
+{
+    auto marks = CAFMarkerList::read(body);
+    if (!marks || change.keepsPlaces())
+        return Bytes(body.begin(), body.end());
+    std::vector<CAFMarker> kept;
+    for (CAFMarker& marker : marks->markers) {
+        const double ratio = change.keepsRate() ? 1 : change.rate / change.sourceRate;
+        const double place = marker.framePosition * ratio - static_cast<double>(change.start);
+        if (!(place >= 0 && place <= static_cast<double>(change.frames)))
+            continue;
+        marker.framePosition = place;
+        kept.push_back(marker);
+    }
+    dropped += marks->markers.size() - kept.size();
+    marks->markers = std::move(kept);
+    marks->missingMarkers = 0;
+    marks->behind.clear();
+    return marks->markers.empty() ? Bytes() : marks->write();
+}

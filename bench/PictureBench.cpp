@@ -34,9 +34,12 @@ KTMem noisyOverview(std::int64_t frames)
     return block;
 }
 
-Waveform waveformOf(const KTMem& block)
+WaveformPicture drawn(const KTMem& block, const PictureSettings& settings = {})
 {
-    return {{OverviewPointsOf(block), OverviewPoints(block)}, OverviewFrames(block), kRate};
+    const Waveform waveform{{OverviewPointsOf(block), OverviewPoints(block)}, OverviewFrames(block), kRate};
+    const PictureFrame frame(settings, {});
+    const auto frames = static_cast<double>(waveform.frames);
+    return pictureOf(frame, drawnPoints(waveform, 0, frames, {}, frame), settings);
 }
 
 /// A WAVE file of silence, mono, 16 bits, that holds an overview of noise.
@@ -69,7 +72,7 @@ void drawPNGFromStored(benchmark::State& state)
     const FileWithOverview file(static_cast<std::int64_t>(kRate) * 600);
     for (auto _ : state) {
         const std::unique_ptr<KTMem> block = ReadOverviewFromAudioFile(file.reference(), 0);
-        benchmark::DoNotOptimize(pngOf(pictureOf(waveformOf(*block), {}), defaultColors()));
+        benchmark::DoNotOptimize(pngOf(drawn(*block), defaultColors()));
     }
 }
 BENCHMARK(drawPNGFromStored)->Unit(benchmark::kMillisecond);
@@ -80,7 +83,7 @@ void drawPNGOfTwelveHours(benchmark::State& state)
     PictureSettings settings;
     settings.scale = true;
     for (auto _ : state)
-        benchmark::DoNotOptimize(pngOf(pictureOf(waveformOf(block), settings), defaultColors()));
+        benchmark::DoNotOptimize(pngOf(drawn(block, settings), defaultColors()));
 }
 BENCHMARK(drawPNGOfTwelveHours)->Unit(benchmark::kMillisecond);
 
@@ -88,7 +91,7 @@ void drawSVGOfTwelveHours(benchmark::State& state)
 {
     const KTMem block = noisyOverview(static_cast<std::int64_t>(kRate) * 3600 * 12);
     for (auto _ : state)
-        benchmark::DoNotOptimize(svgOf(pictureOf(waveformOf(block), {}), defaultColors(), "twelve hours"));
+        benchmark::DoNotOptimize(svgOf(drawn(block), defaultColors(), "twelve hours"));
 }
 BENCHMARK(drawSVGOfTwelveHours)->Unit(benchmark::kMillisecond);
 

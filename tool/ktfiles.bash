@@ -27,6 +27,7 @@ _ktfiles()
         decode/--bits) COMPREPLY=($(compgen -W '16 24 32 f32' -- "$cur")); return ;;
         decode/--rate) COMPREPLY=($(compgen -W '44100 48000 88200 96000' -- "$cur")); return ;;
         overview/--format) COMPREPLY=($(compgen -W 'audiowaveform' -- "$cur")); return ;;
+        overview/--gain) COMPREPLY=($(compgen -W 'auto 6 12 24' -- "$cur")); return ;;
         overview/--channels) COMPREPLY=($(compgen -W 'split sum 1 2' -- "$cur")); return ;;
         decode/--channels | */--frames | */--frames-per-point) return ;;
     esac
@@ -60,7 +61,7 @@ _ktfiles()
             adm/*) COMPREPLY=($(compgen -W "--long --lenient --check --threads $files $common" -- "$cur")) ;;
             tags/set | tags/remove | tags/copy) COMPREPLY=($(compgen -W "$files $edit $common" -- "$cur")) ;;
             overview/*) COMPREPLY=($(compgen -W "--png --svg --width --height --start --end --frames --scale --colors
-                --channels --format --output --frames-per-point --force --stored --store --threads $files $edit $common" -- "$cur")) ;;
+                --channels --gain --scale-factor --format --output --frames-per-point --force --stored --store --threads $files $edit $common" -- "$cur")) ;;
             decode/*) COMPREPLY=($(compgen -W "--output --format --rate --channels --bits --start --end --frames --conceal
                 --force --threads $files $common" -- "$cur")) ;;
             lock/*) COMPREPLY=($(compgen -W "--read --write --presenter --timeout -- $common" -- "$cur")) ;;

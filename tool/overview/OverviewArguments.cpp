@@ -3,18 +3,51 @@
 #include "tool/shared/arguments/SoundRange.h"
 #include "tool/shared/arguments/ThreadsOption.h"
 
+#include <charconv>
+#include <cmath>
 #include <unistd.h>
 
 namespace {
 
 constexpr std::pair kWidths{16, 16384};
 constexpr std::pair kHeights{8, 4096};
+constexpr std::pair kScaleFactors{1, 4};
+constexpr double kMostGain = 120; // decibels
 constexpr std::pair kFramesPerPoint{1, 1 << 24};
 
 void addSize(Verb& verb, const std::string& name, int& pixels, std::pair<int, int> range)
 {
     verb.addNumber(name, pixels, range,
                    fmt::format("Its size in pixels, {} to {}; else {}", range.first, range.second, pixels));
+}
+
+// "auto" is a gain that is found; none for another text.
+std::optional<std::optional<double>> gainFromText(const std::string& text)
+{
+    if (text == "auto")
+        return std::optional<double>();
+    double gain = 0;
+    const std::size_t sign = text.starts_with('+') ? 1 : 0;
+    const auto [end, error] = std::from_chars(text.data() + sign, text.data() + text.size(), gain);
+    if (error != std::errc() || end != text.data() + text.size() || !(std::abs(gain) <= kMostGain))
+        return std::nullopt;
+    return std::optional(gain);
+}
+
+void addGain(Verb& verb, std::optional<double>& gain)
+{
+    verb.addText(
+            "--gain",
+            [&gain](const std::string& text) {
+                if (const auto parsed = gainFromText(text))
+                    gain = *parsed;
+            },
+            "Draw the wave higher by so many decibels; auto: so high that its peak is at full scale",
+            [](const std::string& text) {
+                return gainFromText(text) ? ""
+                                          : "\"" + printable(text) + "\" is neither auto nor decibels, -120 to 120";
+            })
+        .label("DB");
 }
 
 void addPictureOptions(Verb& verb, OverviewArguments& arguments)
@@ -24,6 +57,8 @@ void addPictureOptions(Verb& verb, OverviewArguments& arguments)
     CommandLine::addForceOption(verb, arguments.existing);
     addSize(verb, "--width", arguments.picture.width, kWidths);
     addSize(verb, "--height", arguments.picture.height, kHeights);
+    verb.addNumber("--scale-factor", arguments.picture.scaleFactor, kScaleFactors,
+                   "So many pixels for each of these: lines and letters are as much larger");
     addSoundRange(verb, {.start = [&arguments](const SoundLength& start) { arguments.start = start; },
                          .end = [&arguments](const SoundLength& end) { arguments.end = end; },
                          .frames = [&arguments](const SoundLength& frames) { arguments.frames = frames; }});
@@ -36,17 +71,19 @@ void addPictureOptions(Verb& verb, OverviewArguments& arguments)
     verb.addText("--channels", takeChannels, "split: each by itself; sum: their average; or the number of one of them",
                  channelsProblem)
         .label("CHANNELS");
+    addGain(verb, arguments.picture.gain);
     verb.addFlag("--scale", arguments.picture.scale, "Show a scale of the amplitude, in decibels");
     const auto takeColors = [&arguments](const std::string& text) {
         arguments.colors = colorsFromText(text).value_or(arguments.colors);
     };
     const auto colorsProblem = [](const std::string& text) {
-        return colorsFromText(text) ? ""
-                                    : "\"" + printable(text) + "\" is neither WAVE,BACKGROUND[,AXIS], as in " +
-                                          "1f6feb,ffffff, nor one of " + themeNames();
+        return colorsFromText(text)
+                   ? ""
+                   : "\"" + printable(text) + "\" is neither WAVE,BACKGROUND[,AXIS[,CLIPPING]], as in " +
+                         "1f6feb,ffffff, nor one of " + themeNames();
     };
     verb.addText("--colors", takeColors,
-                 "WAVE,BACKGROUND[,AXIS] as RRGGBB, the background also none; or one of: " + themeNames(),
+                 "WAVE,BACKGROUND[,AXIS[,CLIPPING]] as RRGGBB, the background also none; or one of: " + themeNames(),
                  colorsProblem)
         .label("COLORS");
 }
@@ -108,7 +145,7 @@ void requireSense(const OverviewArguments& arguments, const Verb& verb, const Ou
     if (arguments.draws() && arguments.files.maybeSeveral())
         throw UsageError("--png and --svg draw one file at a time");
     if (!arguments.draws())
-        requireNothingElseGiven(verb, {"--width", "--height", "--colors", "--scale"},
+        requireNothingElseGiven(verb, {"--width", "--height", "--colors", "--scale", "--scale-factor", "--gain"},
                                 " is about a picture: --png or --svg says where to");
     if (!arguments.writes())
         requireNothingElseGiven(verb, {"--start", "--end", "--frames", "--channels", "--force"},

@@ -1,4 +1,5 @@
 // ktfiles overview: waveforms as sparklines, numbers and pictures, and stored in the files.
+#include "tool/overview/DrawnSamples.h"
 #include "tool/overview/OverviewArguments.h"
 #include "tool/overview/OverviewReport.h"
 #include "tool/overview/OverviewStore.h"
@@ -24,11 +25,7 @@ struct Task {
 struct Reading {
     FileOverview overview;
     FileVersion version;
-};
-
-/// The part of a sound that is asked for, in frames.
-struct FrameRange {
-    std::int64_t from = 0, to = 0;
+    std::optional<WaveformPicture> picture = {};
 };
 
 FrameRange rangeIn(std::int64_t frames, double rate, const OverviewArguments& arguments)
@@ -62,13 +59,8 @@ void writeBytes(const std::string& out, const std::string& path, OutputFile::Exi
         throw Failure("the output could not be written whole");
 }
 
-void drawPictures(const std::string& path, const Waveform& waveform, const OverviewArguments& arguments)
+void writePictures(const std::string& path, const WaveformPicture& picture, const OverviewArguments& arguments)
 {
-    PictureSettings settings = arguments.picture;
-    const FrameRange range = rangeIn(waveform.frames, waveform.sampleRate, arguments);
-    settings.start = static_cast<double>(range.from) / waveform.sampleRate;
-    settings.end = static_cast<double>(range.to) / waveform.sampleRate;
-    const WaveformPicture picture = pictureOf(waveform, settings);
     if (!arguments.png.empty())
         writeBytes(arguments.png, path, arguments.existing,
                    [&](const Sink& sink) { sink(pngOf(picture, arguments.colors)); });
@@ -76,6 +68,28 @@ void drawPictures(const std::string& path, const Waveform& waveform, const Overv
         writeBytes(arguments.svg, path, arguments.existing, [&](const Sink& sink) {
             sink(svgOf(picture, arguments.colors, std::filesystem::path(path).filename().string()));
         });
+}
+
+// From the overview that is stored where it is asked for and fine enough, else from the samples.
+WaveformPicture pictureOfFile(const std::string& path, SoundReader* sound, const FileOverview* stored,
+                              const OverviewArguments& arguments, bool showsProgress)
+{
+    const AudioFileInfo& info = stored != nullptr ? stored->info() : sound->info();
+    const std::int64_t frames = stored != nullptr ? stored->waveform().frames : info.frames;
+    const FrameRange range = rangeIn(frames, sampleRateOf(info), arguments);
+    const PictureSettings& settings = arguments.picture;
+    const std::vector<SoundLane> lanes = lanesFor(arguments.channels, info, range, settings);
+    const PictureFrame frame(settings, lanes);
+    if (stored != nullptr && suffices(*stored, arguments.channels, range, settings)) {
+        const auto from = static_cast<double>(range.from), to = static_cast<double>(range.to);
+        return pictureOf(frame, drawnPoints(stored->waveform(), from, to, lanes.front(), frame), settings);
+    }
+    std::optional<SoundReader> own;
+    if (sound == nullptr)
+        sound = &own.emplace(path);
+    Progress progress("reading", range.to - range.from, !showsProgress);
+    const auto advance = [&progress](std::int64_t done) { progress.advance(done); };
+    return pictureOf(frame, drawnSamples(*sound, range, lanes, frame, advance), settings);
 }
 
 void writeData(const std::string& path, SoundReader& sound, const OverviewArguments& arguments)
@@ -113,12 +127,20 @@ Reading readFile(const std::string& path, const Task& task)
     if (arguments.store)
         requireRoomForOverview(path);
     const bool showsProgress = !arguments.edit.quiet && !arguments.files.maybeSeveral();
-    if (arguments.fromStored)
-        return {FileOverview::stored(path), version};
+    if (arguments.fromStored) {
+        Reading reading{FileOverview::stored(path), version};
+        if (arguments.draws())
+            reading.picture = pictureOfFile(path, nullptr, &reading.overview, arguments, showsProgress);
+        return reading;
+    }
     SoundReader sound(path);
     if (!arguments.data.empty())
         writeData(path, sound, arguments);
-    return {task.needsPoints ? FileOverview::computed(sound, showsProgress) : FileOverview::described(sound), version};
+    Reading reading{task.needsPoints ? FileOverview::computed(sound, showsProgress) : FileOverview::described(sound),
+                    version};
+    if (arguments.draws())
+        reading.picture = pictureOfFile(path, &sound, nullptr, arguments, showsProgress);
+    return reading;
 }
 
 // Files are edited one by one. What was changed meanwhile, if only by the edit of another of its names, is read again.
@@ -137,16 +159,16 @@ void tellOf(const std::string& path, Reading& reading, const OverviewArguments& 
     OverviewDeeds deeds{.png = arguments.png,
                         .svg = arguments.svg,
                         .data = arguments.data,
-                        .width = arguments.picture.width,
-                        .height = arguments.picture.height,
+                        .width = arguments.picture.width * arguments.picture.scaleFactor,
+                        .height = arguments.picture.height * arguments.picture.scaleFactor,
                         .store = {},
                         .dryRun = arguments.edit.dryRun};
     if (!reading.overview.note().empty() && !arguments.edit.quiet) {
         Output::standard().flush();
         reportFailure(path, reading.overview.note());
     }
-    if (arguments.draws())
-        drawPictures(path, reading.overview.waveform(), arguments);
+    if (reading.picture)
+        writePictures(path, *reading.picture, arguments);
     if (arguments.store)
         deeds.store = store(path, reading, arguments);
     report.add(path, reading.overview, deeds);
@@ -160,7 +182,7 @@ bool runOverview(OverviewArguments& arguments, const Verb& verb, OutputOptions o
     if (arguments.takesOutput()) // nothing else
         output.quiet = true;
     OverviewReport report(output, arguments.files);
-    const Task task{arguments, arguments.draws() || arguments.store || output.wantsJson() || !arguments.writes()};
+    const Task task{arguments, arguments.store || output.wantsJson() || !arguments.writes()};
     const bool good = forEachFile(
         arguments.files, {.threads = arguments.threads, .quiet = output.quiet},
         [&](const FoundFile& file) -> FileRest {

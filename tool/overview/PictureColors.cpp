@@ -23,11 +23,11 @@ constexpr Color rgb(std::uint32_t value)
 constexpr Color kNoColor{0, 0, 0, 0};
 
 constexpr std::array kThemes{
-    Theme{"night", {rgb(0x5CD6C0), rgb(0x12161C), rgb(0x93A1B3)}},
-    Theme{"day", {rgb(0x2457C5), rgb(0xFBFBF9), rgb(0x5E6673)}},
-    Theme{"amber", {rgb(0xFFB347), rgb(0x1A1512), rgb(0xAE9B86)}},
-    Theme{"rose", {rgb(0xD6336C), rgb(0xFFF8F9), rgb(0x7C626B)}},
-    Theme{"ink", {rgb(0x16181D), rgb(0xFFFFFF), rgb(0x5A5E66)}},
+    Theme{"night", {rgb(0x5CD6C0), rgb(0x12161C), rgb(0x93A1B3), rgb(0xFF5A52)}},
+    Theme{"day", {rgb(0x2457C5), rgb(0xFBFBF9), rgb(0x5E6673), rgb(0xD92626)}},
+    Theme{"amber", {rgb(0xFFB347), rgb(0x1A1512), rgb(0xAE9B86), rgb(0xFF4B3E)}},
+    Theme{"rose", {rgb(0xD6336C), rgb(0xFFF8F9), rgb(0x7C626B), rgb(0x3B2FB0)}},
+    Theme{"ink", {rgb(0x16181D), rgb(0xFFFFFF), rgb(0x5A5E66), rgb(0xE00000)}},
 };
 
 std::optional<Color> colorFromText(std::string_view text)
@@ -49,6 +49,12 @@ Color axisOn(Color background)
         return rgb(0x808080);
     const int luminance = (299 * background.red + 587 * background.green + 114 * background.blue) / 1000;
     return mixed(background, luminance < 128 ? rgb(0xFFFFFF) : rgb(0x000000), 0.6);
+}
+
+Color clippingBeside(Color wave)
+{
+    const bool isRed = wave.red > 160 && wave.green < 120 && wave.blue < 140;
+    return isRed ? rgb(0x3B6FE0) : rgb(0xE8352B);
 }
 
 } // namespace
@@ -82,14 +88,15 @@ std::optional<PictureColors> colorsFromText(const std::string& text)
             break;
         rest.remove_prefix(comma + 1);
     }
-    if (parts.size() < 2 || parts.size() > 3)
+    if (parts.size() < 2 || parts.size() > 4)
         return std::nullopt;
     const auto wave = colorFromText(parts[0]);
     const auto background = parts[1] == "none" ? std::optional(kNoColor) : colorFromText(parts[1]);
     if (!wave || !background)
         return std::nullopt;
-    const auto axis = parts.size() == 3 ? colorFromText(parts[2]) : std::optional(axisOn(*background));
-    return axis ? std::optional(PictureColors{*wave, *background, *axis}) : std::nullopt;
+    const auto axis = parts.size() > 2 ? colorFromText(parts[2]) : std::optional(axisOn(*background));
+    const auto clipping = parts.size() > 3 ? colorFromText(parts[3]) : std::optional(clippingBeside(*wave));
+    return axis && clipping ? std::optional(PictureColors{*wave, *background, *axis, *clipping}) : std::nullopt;
 }
 
 std::string themeNames()

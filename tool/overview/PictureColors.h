@@ -11,7 +11,7 @@ struct Color {
 };
 
 struct PictureColors {
-    Color wave, background, axis;
+    Color wave, background, axis, clipping;
 };
 
 /// `part` of `to` in `from`, 0 to 1; what is transparent adds no color of its own.
@@ -20,8 +20,9 @@ Color mixed(Color from, Color to, double part);
 /// The default theme.
 PictureColors defaultColors();
 
-/// From the name of a theme, or "WAVE,BACKGROUND[,AXIS]" of hexadecimal colors ("1F6FEB", "#1F6FEB" or "#abc"); the
-/// background may be "none". Without an axis color one is chosen that shows on the background. None for anything else.
+/// From the name of a theme, or "WAVE,BACKGROUND[,AXIS[,CLIPPING]]" of hexadecimal colors ("1F6FEB", "#1F6FEB" or
+/// "#abc"); the background may be "none". Without an axis color one is chosen that shows on the background, and without
+/// one of clipping one that differs from the wave. None for anything else.
 std::optional<PictureColors> colorsFromText(const std::string& text);
 
 /// The names of the themes, for messages and help.

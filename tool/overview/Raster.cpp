@@ -17,8 +17,9 @@ std::array<Color, 256> Raster::palette(const PictureColors& colors)
         palette[static_cast<std::size_t>(i)] =
             mixed(colors.background, colors.wave, static_cast<double>(i) / kWaveLevels);
     for (int i = 1; i <= kAxisLevels; ++i)
-        palette[static_cast<std::size_t>(kWaveLevels + i)] =
+        palette[static_cast<std::size_t>(kClipping + i)] =
             mixed(colors.background, colors.axis, static_cast<double>(i) / kAxisLevels);
+    palette[kClipping] = colors.clipping;
     return palette;
 }
 
@@ -28,8 +29,8 @@ void Raster::putAxis(int x, int y, float coverage)
     if (level <= 0 || x < 0 || y < 0 || x >= width_ || y >= height_)
         return;
     std::uint8_t& pixel = at(x, y);
-    if (pixel == 0 || pixel > kWaveLevels)
-        pixel = std::max(pixel, static_cast<std::uint8_t>(kWaveLevels + level));
+    if (pixel == 0 || pixel > kClipping)
+        pixel = std::max(pixel, static_cast<std::uint8_t>(kClipping + level));
 }
 
 void Raster::fillAxis(float left, float top, float right, float bottom, float tone)

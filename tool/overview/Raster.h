@@ -1,8 +1,9 @@
-// A raster of palette indices: a waveform picture knows only the background, the wave on it and the axis on it.
+// A raster of palette indices: a waveform picture knows only the background, the wave, the axis and clipping on it.
 #pragma once
 
 #include "tool/overview/PictureColors.h"
 
+#include <algorithm>
 #include <array>
 #include <cstdint>
 #include <vector>
@@ -17,20 +18,26 @@ public:
     const std::vector<std::uint8_t>& pixels() const { return pixels_; }
     static std::array<Color, 256> palette(const PictureColors& colors);
 
-    /// The wave over what is there, 0 to 1; nothing of it leaves the pixel alone.
+    /// The wave over the axis, 0 to 1; of two waves the stronger stays. Nothing of it leaves the pixel alone.
     void putWave(int x, int y, float coverage)
     {
-        if (const int level = static_cast<int>(coverage * kWaveLevels + 0.5F); level > 0)
-            at(x, y) = static_cast<std::uint8_t>(level);
+        if (const int level = static_cast<int>(coverage * kWaveLevels + 0.5F); level > 0) {
+            std::uint8_t& pixel = at(x, y);
+            pixel = static_cast<std::uint8_t>(pixel <= kWaveLevels ? std::max<int>(pixel, level) : level);
+        }
     }
+    /// Over all else.
+    void putMark(int x, int y, bool isClipping) { at(x, y) = isClipping ? kClipping : kWholeAxis; }
     /// A part of the axis, 0 to 1; the stronger of two stays. Outside of the raster nothing happens.
     void putAxis(int x, int y, float coverage);
     /// A rectangle of the axis; edges between pixels are softened.
     void fillAxis(float left, float top, float right, float bottom, float tone);
 
 private:
-    static constexpr int kWaveLevels = 191; // indices 1 to 191; 0 is the background
-    static constexpr int kAxisLevels = 64;  // indices 192 to 255
+    static constexpr int kWaveLevels = 190; // indices 1 to 190; 0 is the background
+    static constexpr std::uint8_t kClipping = 191;
+    static constexpr int kAxisLevels = 64; // indices 192 to 255
+    static constexpr std::uint8_t kWholeAxis = 255;
 
     std::uint8_t& at(int x, int y)
     {

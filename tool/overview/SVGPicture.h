@@ -6,5 +6,17 @@
 
 #include <string>
 
-/// The text of the SVG file. `title` may hold anything.
+/// Digits are 0.73 of the font size high in most sans-serif fonts.
+inline constexpr float kSVGFontSize = kLabelHeight / 0.73F;
+
+/// The text of the SVG file, whose size is that of the PNG, in the picture's own pixels. `title` may hold anything.
 std::string svgOf(const WaveformPicture& picture, const PictureColors& colors, const std::string& title);
+
+// What a file of several pictures is made of.
+
+/// The root element up to its content, with the background.
+std::string svgHead(int width, int height, int scaleFactor, const PictureColors& colors, const std::string& title);
+/// What is drawn of a picture, its corner at (0, 0).
+std::string svgParts(const WaveformPicture& picture, const PictureColors& colors);
+/// A text for people, fit to stand between tags.
+std::string svgEscaped(const std::string& text);

@@ -16,22 +16,13 @@ struct Waveform {
     double seconds() const { return static_cast<double>(frames) / sampleRate; }
 };
 
-/// Lowest and highest value of a column, and the averages of its points' lowest and highest; -127 to 127.
+/// Lowest and highest value of a column, and the averages of its points' lowest and highest.
 struct WaveformColumn {
     float low = 0, high = 0;
     float meanLow = 0, meanHigh = 0;
 };
 
-/// A place where the outline bends; `x` in columns.
-struct WaveformVertex {
-    float x = 0;
-    float low = 0, high = 0;
-};
-
 /// Folds the points between two frames into `columns` columns. A point that two columns share shows in both, so that no
-/// peak is drawn lower than it is. `from` is less than `to`, and the points reach to `to`.
+/// peak is drawn lower than it is. `from` is less than `to`, and the points reach to `to`. Values are those of the
+/// points, -127 to 127.
 std::vector<WaveformColumn> foldedColumns(const Waveform& waveform, double from, double to, int columns);
-
-/// The outline where there are fewer points than columns: a curve through the points' centres that never swings beyond
-/// them, as vertices at most two columns apart, from x 0 to x `columns`.
-std::vector<WaveformVertex> smoothOutline(const Waveform& waveform, double from, double to, int columns);

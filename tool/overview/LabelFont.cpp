@@ -2,6 +2,7 @@
 
 #include "tool/overview/LabelGlyphs.h"
 #include "tool/overview/Raster.h"
+#include "tool/shared/output/DisplayWidth.h"
 
 #include <algorithm>
 #include <cmath>
@@ -24,20 +25,6 @@ struct Point {
 struct Segment {
     Point from, to;
 };
-
-// The next character; of bytes that are no UTF-8 one each.
-char32_t takeCharacter(std::string_view& text)
-{
-    const auto byte = [&text](std::size_t i) { return static_cast<unsigned char>(text[i]); };
-    const unsigned char first = byte(0);
-    const std::size_t length = first < 0xC2 ? 1 : first < 0xE0 ? 2 : first < 0xF0 ? 3 : first < 0xF5 ? 4 : 1;
-    char32_t character = length == 1 ? first : first & (0xFF >> (length + 1));
-    std::size_t taken = 1;
-    for (; taken < length && taken < text.size() && (byte(taken) & 0xC0) == 0x80; ++taken)
-        character = character << 6 | (byte(taken) & 0x3F);
-    text.remove_prefix(taken);
-    return taken < length ? 0xFFFD : character;
-}
 
 struct PlacedGlyph {
     LabelGlyph glyph;

@@ -1,6 +1,6 @@
 #include "tool/overview/LabelGlyphs.h"
 
-#include "tool/shared/output/Terminal.h"
+#include "tool/shared/output/DisplayWidth.h"
 
 #include <string>
 

@@ -109,6 +109,8 @@ TEST(ContainerCheck, OneFaultIsOneFinding)
          0},
         {buildContainer(kWAVEFile, chunksOf(kWAVEFile, {{fourCC("LIST"), "INFOINAM\4\0\0\0odd"s}})),
          Kind::chunkReachesOut, "INAM", 72, 83, 84},
+        {buildContainer(kWAVEFile, chunksOf(kWAVEFile, {{fourCC("LIST"), "INFOINAM\3\0\0\0oddIART\2\0\0\0me"s}})),
+         Kind::padIsMissing, "INAM", 72, 0, 3},
         {with(wave, 28, "\7"s), Kind::byteRateDiffers, "fmt ", 12, 88071, 88200},
         {with(wave, 20, "\x55"s), Kind::factIsMissing, "fact", 0, 0, 0}, // MP3
         {with(long64, 44, "\2"s), Kind::tableIsShort, "ds64", 12, 2, 0},

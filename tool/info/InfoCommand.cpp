@@ -285,7 +285,7 @@ void declareInfo(CommandLine& commandLine)
     const Argument md5 = verb.addFlag("--md5", wanted.wantsMD5, "Also the MD5 of the sound as it is stored");
     const Argument sha256 = verb.addFlag("--sha256", wanted.wantsSHA256, "Also the SHA-256 of the sound");
     verb.addFlag("--check", wanted.isCheck,
-                 "Instead what is off, a line each: sizes, order, pads, counts; none: all is well")
+                 "Instead what is off, a line each: sizes, order, counts, digests, tracks; none: all is well")
         .excludes(isLong)
         .excludes(md5)
         .excludes(sha256);

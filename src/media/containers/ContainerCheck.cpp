@@ -226,7 +226,13 @@ void Check::checkList(const WalkedChunk& chunk)
             add({.kind = Kind::chunkReachesOut, .chunk = id, .offset = at, .stated = end, .found = bodyEnd});
             return;
         }
-        at = bodyEnd + (size & 1);
+        const std::byte* const next =
+            (size & 1) != 0 && bodyEnd + sizeof(ChkHeader) <= end ? window_.at(bodyEnd, sizeof(ChkHeader)) : nullptr;
+        const bool isPadless = isName(next) && load<std::uint32_t>(next + sizeof(FourCC), traits().order) <=
+                                                   end - bodyEnd - sizeof(ChkHeader);
+        if (isPadless)
+            add({.kind = Kind::padIsMissing, .chunk = id, .offset = at, .found = size});
+        at = bodyEnd + (isPadless ? 0 : size & 1);
     }
 }
 

@@ -137,13 +137,36 @@ class Metadata(CommandTest):
         marks = subprocess.run(["sndfile-info", "x.aiff"], cwd=self.folder, capture_output=True, text=True).stdout
         self.assertEqual(re.findall(r"Position : (\d+)\s+Name     : (\w+)", marks), [("0", "one"), ("4800", "two"), ("9600", "end")])
 
+    def test_points_in_compressed_sound(self):
+        """Their offsets count from the block on that they name, and mean nothing behind the decoder."""
+        fmt = chunk(b"fmt ", struct.pack("<HHIIHHHH", 17, 1, 8000, 4055, 256, 4, 2, 505))
+        point = chunk(b"cue ", struct.pack("<IIi4sIII", 1, 1, 510, b"data", 0, 256, 5))
+        body = b"WAVE" + fmt + chunk(b"fact", struct.pack("<I", 1010)) + chunk(b"data", bytes(512)) + point
+        self.write("a.wav", b"RIFF" + struct.pack("<I", len(body)) + body)
+        self.assertEqual((self.decode()["kept"], self.get("out.wav", "cue")), (["cue"], cues((1, 510))[8:]))
+        self.decode(out="x.aiff")
+        self.assertEqual(self.get("x.aiff", "MARK"), struct.pack(">HhIBx", 1, 1, 510, 0))
+
+    def test_remarks_of_aiff(self):
+        comments = struct.pack(">HIhH", 2, 7, 0, 3) + b"who\0" + struct.pack(">IhH", 8, 1, 4) + b"mark"
+        body = b"AIFF" + b"".join(chunk(*item, ">") for item in (
+            (b"COMM", struct.pack(">hIh", 1, 4, 16) + b"\x40\x0e\xbb\x80" + bytes(6)), (b"ANNO", b"one"), (b"COMT", comments),
+            (b"ANNO", b"two"), (b"SSND", bytes(16))))
+        self.write("a.wav", b"FORM" + struct.pack(">I", len(body)) + body)
+        self.decode(out="x.aiff")
+        self.assertEqual([line.split()[0] for line in self.lines("chunks", "x.aiff")], ["COMM", "ANNO", "COMT", "ANNO", "SSND"])
+        self.assertEqual(self.get("x.aiff", "COMT"), comments)
+        self.assertEqual(self.decode(out="x.caf")["notKept"], ["ANNO is not carried over", "of its markers only places and names are kept"])
+        self.decode()
+        self.assertEqual(self.get("out.wav", "LIST"), info(ICMT="one\nwho\ntwo")[8:])
+
     def test_texts_in_other_encodings(self):
         name, latin = chunk(b"NAME", b"\x8a", ">"), chunk(b"LIST", b"INFO" + chunk(b"INAM", b"\xe4\0"))
         aiff = b"AIFF" + name + chunk(b"COMT", struct.pack(">HIhH", 1, 0, 0, 3) + b"who\0", ">") + chunk(b"ANNO", b"what", ">") + \
             chunk(b"COMM", struct.pack(">hIh", 1, 4, 16) + b"\x40\x0e\xbb\x80" + bytes(6), ">") + chunk(b"SSND", bytes(16), ">")
         self.write("a.wav", b"FORM" + struct.pack(">I", len(aiff)) + aiff)
         self.decode()
-        self.assertEqual(self.get("out.wav", "LIST"), info(INAM="ä", ICMT="what\nwho")[8:])
+        self.assertEqual(self.get("out.wav", "LIST"), info(INAM="ä", ICMT="who\nwhat")[8:])
         self.write("a.wav", wave(latin, frames=9600))
         self.decode(out="x.caf")
         self.assertEqual(self.get("x.caf", "info"), b"\0\0\0\1title\0\xc3\xa4\0")

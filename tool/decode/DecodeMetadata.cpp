@@ -17,10 +17,11 @@ using platform::ContainerKind;
 namespace {
 
 constexpr FourCC kBext = fourCC("bext"), kIXML = fourCC("iXML"), kAxml = fourCC("axml"), kChna = fourCC("chna"),
-                 kCue = fourCC("cue "), kList = fourCC("LIST"), kMark = fourCC("MARK"), kComments = fourCC("COMT"),
-                 kCAFInfo = fourCC("info"), kCAFMarkers = fourCC("mark"), kCAFTexts = fourCC("strg");
+                 kCue = fourCC("cue "), kList = fourCC("LIST"), kMark = fourCC("MARK"), kRemark = fourCC("ANNO"),
+                 kComments = fourCC("COMT"), kCAFInfo = fourCC("info"), kCAFMarkers = fourCC("mark"),
+                 kCAFTexts = fourCC("strg");
 constexpr std::array kOfWAVE{kBext, kIXML, kAxml, kChna, kCue, kList};
-constexpr std::array kOfAIFF{kMark, kComments, fourCC("NAME"), fourCC("AUTH"), fourCC("(c) "), fourCC("ANNO")};
+constexpr std::array kOfAIFF{kMark, kComments, fourCC("NAME"), fourCC("AUTH"), fourCC("(c) "), kRemark};
 constexpr std::array kOfCAF{kCAFInfo, kCAFMarkers, kCAFTexts};
 constexpr std::array<std::string_view, 7> kOfTexts{"INFO", "info", "NAME", "AUTH", "(c)", "ANNO", "COMT"};
 /// More than people write; it is held in memory.
@@ -99,7 +100,7 @@ public:
           fileType_(fileType),
           changed_(changed),
           tagsFollow_(tagsFollow),
-          cues_(changed.change, source.order_)
+          cues_(changed.change, source.order_, source.isLinearPCM_)
     {
     }
 
@@ -166,7 +167,7 @@ private:
                 keep(kCAFMarkers, {kCAFMarkers, movedCAFMarkers(body, change(), dropped_)});
             else if (chunk.id == kCAFInfo)
                 copyCAFInfo(chunk);
-            else if (chunk.id == kCAFTexts || chunk.id == fourCC("ANNO") || !tagsFollow_)
+            else if (chunk.id == kCAFTexts || chunk.id == kRemark || chunk.id == kComments || !tagsFollow_)
                 keep(chunk.id, chunk);
         }
         if (leavesList)
@@ -249,25 +250,31 @@ private:
             }
         for (const HeldChunk& chunk : source_.chunks_)
             if (chunk.id == kCue) {
-                markers.addFromWAVE(chunk.body, lists, source_.order_);
+                markers.addFromWAVE(chunk.body, lists, source_.order_, source_.isLinearPCM_);
                 told(kCue);
             }
         if (!leavesList)
             told(kList);
     }
 
+    /// The loop's tags bring comments that take the place of remarks.
     void readAIFF(PortableTexts& texts, PortableMarkers& markers)
     {
+        PortableTexts comments;
+        for (const HeldChunk& chunk : source_.chunks_)
+            if (chunk.id == kComments)
+                markers.hasMore = comments.addComments(chunk.body) || markers.hasMore;
         for (const HeldChunk& chunk : source_.chunks_) {
+            if (chunk.id == kRemark && tagsFollow_ && !comments.texts.empty())
+                continue;
             if (chunk.id == kMark)
                 markers.addFromAIFF(chunk.body);
-            else if (chunk.id == fourCC("ANNO") || !tagsFollow_)
+            else if (chunk.id == kComments && !tagsFollow_)
+                texts.addComments(chunk.body);
+            else if (chunk.id == kRemark || !tagsFollow_)
                 texts.addFromAIFF(chunk.id, chunk.body);
             told(chunk.id);
         }
-        for (const HeldChunk& chunk : source_.chunks_)
-            if (chunk.id == kComments && !tagsFollow_)
-                markers.hasMore = texts.addComments(chunk.body) || markers.hasMore;
     }
 
     void readCAF(PortableTexts& texts, PortableMarkers& markers)

@@ -9,7 +9,8 @@
 
 #include <algorithm>
 #include <limits>
-#include <set>
+#include <unordered_map>
+#include <unordered_set>
 
 namespace {
 
@@ -20,6 +21,12 @@ std::optional<std::uint32_t> place32(const SoundChange& change, std::uint32_t fr
 {
     const auto place = change.placeOf(frame);
     return place && *place <= kMost32 ? std::optional(static_cast<std::uint32_t>(*place)) : std::nullopt;
+}
+
+/// In blocks of a compressed sound the offset counts from the block on, and the position from the start.
+std::uint32_t frameOf(const CuePoint& point, bool isLinearPCM)
+{
+    return !isLinearPCM && std::uint32_t{point.blockStart} != 0 ? point.position : point.sampleOffset;
 }
 
 /// All bytes set.
@@ -35,14 +42,14 @@ const CAFTimecode kNoTimecode = [] {
 Bytes CueMove::movedCues(BytesView body)
 {
     auto cues = CueList::read(body, order_);
-    if (!cues || (change_.keepsPlaces() && order_ == std::endian::little))
+    if (!cues || (keepsPlaces() && isLinearPCM_))
         return {body.begin(), body.end()};
     std::vector<CuePoint> kept;
     for (CuePoint point : cues->points) {
-        const std::uint32_t frame = point.sampleOffset;
+        const std::uint32_t frame = frameOf(point, isLinearPCM_);
         const auto place = place32(change_, frame);
         if (!place) {
-            dropped_.push_back(point.id);
+            dropped_.insert(point.id);
             continue;
         }
         const std::uint32_t position = point.position;
@@ -60,49 +67,49 @@ Bytes CueMove::movedCues(BytesView body)
 Bytes CueMove::movedLabels(BytesView body) const
 {
     auto list = AssociatedDataList::read(body, order_);
-    if (!list || (change_.keepsPlaces() && order_ == std::endian::little))
-        return Bytes(body.begin(), body.end());
+    if (!list || keepsPlaces())
+        return {body.begin(), body.end()};
     AssociatedDataList moved;
-    if (order_ != std::endian::little) { // items are numbers of the other order
+    if (order_ == std::endian::little) {
+        moved = std::move(*list);
+    } else { // items are numbers of the other order
         for (const CueText& label : list->labels())
-            moved.setLabel(label.cueId, label.text);
+            moved.addLabel(label.cueId, label.text);
         for (const CueText& note : list->notes())
-            moved.setNote(note.cueId, note.text);
+            moved.addNote(note.cueId, note.text);
         for (const CueRange& range : list->ranges())
             moved.setRange(range);
-    } else {
-        moved = *list;
     }
-    for (const std::uint32_t id : dropped_)
-        moved.eraseCue(id);
-    for (CueRange range : moved.ranges()) {
-        const std::uint64_t length = std::min(change_.scaled(range.sampleLength), change_.frames);
-        range.sampleLength = static_cast<std::uint32_t>(std::min(length, kMost32));
-        moved.setRange(range);
-    }
+    moved.eraseCues([this](std::uint32_t id) { return dropped_.contains(id); });
+    moved.changeRanges([this](CueRangeFields& fields) {
+        const std::uint64_t length = std::min(change_.scaled(fields.sampleLength), change_.frames);
+        fields.sampleLength = static_cast<std::uint32_t>(std::min(length, kMost32));
+    });
     return moved.items().empty() ? Bytes() : moved.write();
 }
 
-void PortableMarkers::addFromWAVE(BytesView body, const std::vector<BytesView>& lists, std::endian order)
+void PortableMarkers::addFromWAVE(BytesView body, const std::vector<BytesView>& lists, std::endian order,
+                                  bool isLinearPCM)
 {
     const auto cues = CueList::read(body, order);
     if (!cues)
         return;
-    std::vector<AssociatedDataList> labels;
+    std::unordered_map<std::uint32_t, std::string> names, notes;
     for (const BytesView list : lists)
-        if (auto read = AssociatedDataList::read(list, order))
-            labels.push_back(std::move(*read));
-    for (const CuePoint& point : cues->points) {
-        PortableMarker marker{point.id, point.sampleOffset, {}};
-        for (const AssociatedDataList& list : labels) {
-            const auto label = list.labelOf(marker.id), note = list.noteOf(marker.id);
-            if (marker.name.empty())
-                marker.name = textInUTF8(label.value_or(note.value_or("")), false);
-            hasMore = hasMore || (label && note);
+        if (const auto read = AssociatedDataList::read(list, order)) {
+            for (const CueText& label : read->labels())
+                names.emplace(label.cueId, label.text);
+            for (const CueText& note : read->notes())
+                notes.emplace(note.cueId, note.text);
+            hasMore = hasMore || !read->ranges().empty();
         }
-        markers.push_back(std::move(marker));
+    for (const CuePoint& point : cues->points) {
+        const std::uint32_t id = point.id;
+        const auto name = names.find(id), note = notes.find(id);
+        hasMore = hasMore || (name != names.end() && note != notes.end());
+        const std::string text = name != names.end() ? name->second : note != notes.end() ? note->second : "";
+        markers.push_back({id, frameOf(point, isLinearPCM), textInUTF8(text, false)});
     }
-    hasMore = hasMore || std::ranges::any_of(labels, [](const auto& list) { return !list.ranges().empty(); });
 }
 
 void PortableMarkers::addFromAIFF(BytesView body)
@@ -149,7 +156,7 @@ std::vector<HeldChunk> PortableMarkers::chunksFor(FourCC fileType, std::size_t& 
     MarkerList marks;
     CAFMarkerList cafMarks;
     CAFStringTable names;
-    std::set<std::uint32_t> ids;
+    std::unordered_set<std::uint32_t> ids;
     const bool isAIFF = fileType == kAIFF;
     const std::uint32_t mostId = isAIFF ? 32767 : std::numeric_limits<std::uint32_t>::max();
     for (const PortableMarker& marker : markers) {
@@ -169,7 +176,7 @@ std::vector<HeldChunk> PortableMarkers::chunksFor(FourCC fileType, std::size_t& 
             point.id = id;
             point.position = point.sampleOffset = frame;
             if (!marker.name.empty())
-                labels.setLabel(id, marker.name);
+                labels.addLabel(id, marker.name);
         } else if (fileType == kCaff) {
             CAFMarker& moved = cafMarks.markers.emplace_back();
             moved.framePosition = static_cast<double>(marker.frame);

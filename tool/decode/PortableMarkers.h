@@ -6,13 +6,19 @@
 #include "tool/decode/SoundChange.h"
 
 #include <string>
+#include <unordered_set>
 #include <vector>
 
 /// The chunks "cue " and LIST "adtl" of one WAVE file, whose points are moved and dropped together.
 class CueMove {
 public:
-    /// Of RIFX the order is big. What is written is little-endian.
-    CueMove(const SoundChange& change, std::endian order) : change_(change), order_(order) {}
+    /// Of RIFX the order is big. What is written is little-endian, and of linear PCM.
+    CueMove(const SoundChange& change, std::endian order, bool isLinearPCM)
+        : change_(change),
+          order_(order),
+          isLinearPCM_(isLinearPCM)
+    {
+    }
 
     /// Empty when no point is left.
     Bytes movedCues(BytesView body);
@@ -21,9 +27,12 @@ public:
     std::size_t dropped() const { return dropped_.size(); }
 
 private:
+    bool keepsPlaces() const { return change_.keepsPlaces() && order_ == std::endian::little; }
+
     SoundChange change_;
     std::endian order_;
-    std::vector<std::uint32_t> dropped_; // ids
+    bool isLinearPCM_;
+    std::unordered_set<std::uint32_t> dropped_; // ids
 };
 
 struct PortableMarker {
@@ -37,7 +46,7 @@ struct PortableMarkers {
     std::vector<PortableMarker> markers;
     bool hasMore = false; // than places and names: remarks, ranges
 
-    void addFromWAVE(BytesView cues, const std::vector<BytesView>& lists, std::endian order);
+    void addFromWAVE(BytesView cues, const std::vector<BytesView>& lists, std::endian order, bool isLinearPCM);
     void addFromAIFF(BytesView marks);
     /// `names` is the body of the "strg", or nothing.
     void addFromCAF(BytesView marks, BytesView names);

@@ -19,6 +19,13 @@ Bytes withText(ByteWriter fields, std::string_view text)
     return fields.take();
 }
 
+Bytes cueText(std::uint32_t cueId, std::string_view text, std::endian order)
+{
+    ByteWriter writer(order);
+    writer.write(cueId);
+    return withText(std::move(writer), text);
+}
+
 } // namespace
 
 std::optional<AssociatedDataList> AssociatedDataList::read(BytesView body, std::endian order)
@@ -60,9 +67,38 @@ std::optional<std::string> AssociatedDataList::textOf(FourCC id, std::uint32_t c
 
 void AssociatedDataList::setText(FourCC id, std::uint32_t cueId, std::string_view text)
 {
-    ByteWriter writer(order());
-    writer.write(cueId);
-    put(id, cueId, withText(std::move(writer), text));
+    put(id, cueId, cueText(cueId, text, order()));
+}
+
+void AssociatedDataList::addText(FourCC id, std::uint32_t cueId, std::string_view text)
+{
+    insert(items().size(), id, cueText(cueId, text, order()));
+}
+
+void AssociatedDataList::changeRanges(const std::function<void(CueRangeFields& fields)>& change)
+{
+    for (std::size_t index = 0; index < items().size(); ++index) {
+        const ListItem& item = items()[index];
+        ByteReader reader(item.body, order());
+        auto fields = takeRecord<CueRangeFields>(reader, order());
+        if (item.id != kRange || !fields)
+            continue;
+        change(*fields);
+        ByteWriter writer(order());
+        putRecord(writer, *fields, order());
+        writer.write(reader.rest());
+        if (const Bytes body = writer.take(); body != item.body)
+            replaceBody(index, body);
+    }
+}
+
+void AssociatedDataList::eraseCues(const std::function<bool(std::uint32_t cueId)>& isGone)
+{
+    eraseIf([&](const ListItem& item) {
+        const bool speaks = item.id == fourCC("labl") || item.id == fourCC("note") || item.id == kRange;
+        return speaks && item.body.size() >= sizeof(std::uint32_t) &&
+               isGone(load<std::uint32_t>(item.body.data(), order()));
+    });
 }
 
 void AssociatedDataList::setRange(const CueRange& range)
@@ -84,10 +120,5 @@ void AssociatedDataList::put(FourCC id, std::uint32_t cueId, Bytes body)
 
 void AssociatedDataList::eraseCue(std::uint32_t cueId)
 {
-    for (std::size_t index = items().size(); index-- > 0;)
-        for (const FourCC id : {fourCC("labl"), fourCC("note"), kRange})
-            if (speaksOf(id, cueId, order())(items()[index])) {
-                erase(index);
-                break;
-            }
+    eraseCues([cueId](std::uint32_t each) { return each == cueId; });
 }

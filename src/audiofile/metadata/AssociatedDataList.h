@@ -4,6 +4,8 @@
 #include "audiofile/metadata/ListChunk.h"
 #include "audiofile/metadata/Records.h"
 
+#include <functional>
+
 /// "labl", the name of a point, or "note", a remark on it. Texts are bytes up to a NUL, in the encoding of the writer.
 struct CueText {
     std::uint32_t cueId = 0;
@@ -62,9 +64,20 @@ public:
     /// All that is said of a point.
     void eraseCue(std::uint32_t cueId);
 
+    // In one pass over lists of many points.
+
+    /// Behind the last item, of points of which nothing of the kind is said yet.
+    void addLabel(std::uint32_t cueId, std::string_view text) { addText(fourCC("labl"), cueId, text); }
+    void addNote(std::uint32_t cueId, std::string_view text) { addText(fourCC("note"), cueId, text); }
+    /// Of every range, whose text stays to the byte.
+    void changeRanges(const std::function<void(CueRangeFields& fields)>& change);
+    /// As eraseCue, of all points that `isGone` says yes to.
+    void eraseCues(const std::function<bool(std::uint32_t cueId)>& isGone);
+
 private:
     std::vector<CueText> texts(FourCC id) const;
     std::optional<std::string> textOf(FourCC id, std::uint32_t cueId) const;
     void setText(FourCC id, std::uint32_t cueId, std::string_view text);
+    void addText(FourCC id, std::uint32_t cueId, std::string_view text);
     void put(FourCC id, std::uint32_t cueId, Bytes body);
 };

@@ -41,6 +41,11 @@ protected:
     void replaceBody(std::size_t index, Bytes body);
     void insert(std::size_t index, FourCC id, Bytes body);
     void erase(std::size_t index);
+    template <class Condition>
+    void eraseIf(Condition condition)
+    {
+        std::erase_if(items_, condition);
+    }
 
 private:
     void settlePadding();

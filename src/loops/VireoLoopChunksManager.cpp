@@ -13,6 +13,13 @@ VireoLoopChunksManager::VireoLoopChunksManager(platform::URLRef fileURL, platfor
         audioFileTypeID_ = file_->fileType();
 }
 
+VireoLoopChunksManager::VireoLoopChunksManager(std::unique_ptr<platform::AudioFile> file)
+    : audioFileTypeID_(file ? file->fileType() : 0),
+      status_(file ? kStatusOK : kStatusFileNotFound),
+      file_(std::move(file))
+{
+}
+
 void VireoLoopChunksManager::readChunks(Chunks chunks)
 {
     if (!file_)

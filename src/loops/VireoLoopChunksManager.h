@@ -17,10 +17,13 @@ public:
     explicit VireoLoopChunksManager(platform::URLRef fileURL, platform::AudioFile::Permission permission =
                                                                   platform::AudioFile::Permission::readWrite);
 
+    /// Of a file that the audio-file service has open, which is of any kind; fileURL() is null.
+    explicit VireoLoopChunksManager(std::unique_ptr<platform::AudioFile> file);
+
     /// The status of opening: 0, or why the manager does nothing.
     std::int32_t status() const { return status_; }
     const platform::URLRef& fileURL() const { return fileURL_; }
-    /// "AIFF", "AIFC", "WAVE" or "caff"; 0 until it is known.
+    /// "AIFF", "AIFC", "WAVE" or "caff", or what the service calls the file given; 0 until it is known.
     FourCC audioFileTypeID() const { return audioFileTypeID_; }
     /// The open file, null when there is none; owned by the manager.
     platform::AudioFile* audioFile() { return file_.get(); }

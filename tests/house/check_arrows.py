@@ -24,7 +24,7 @@ ARROWS = {
     "loops/tagging": {"platform/core"},
     "audiofile/metadata": {"loops/tagging", "platform/core"},
     "audiofile": {"files", "loops/tagging", "media/decoding", "platform"},
-    "loops": {"audiofile", "files", "loops/tagging", "media/decoding", "platform"},
+    "loops": {"audiofile", "audiofile/metadata", "files", "loops/tagging", "media/decoding", "platform"},
     "loops/overview": {"audiofile", "files", "media/samples", "platform"},
     "adm": {"platform"},
     "project": {"files", "platform"},

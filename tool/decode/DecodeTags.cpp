@@ -162,7 +162,7 @@ CarriedTags DecodeTags::carryTo(const std::string& output, const std::string& co
     if (sound.sampleRate != sourceRate && sourceRate > 0)
         scaleTransients(sound.sampleRate / sourceRate);
     try {
-        const TagsPlan plan = planTagsCopy(source_, readLoopTags(output), output);
+        const TagsPlan plan = planTagsCopy(source_, readOwnLoopTags(output), output);
         if (!plan.changes.empty())
             writeTags(output, plan);
         for (const TagChange& change : plan.changes)

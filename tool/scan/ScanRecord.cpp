@@ -23,9 +23,10 @@ bool isCalledLoop(const std::string& path)
 {
     const std::size_t dot = path.rfind('.');
     std::string extension = dot == std::string::npos ? "" : path.substr(dot);
+    constexpr std::string_view kExtensions[] = {".aif", ".aiff", ".aifc", ".caf", ".wav"};
     std::transform(extension.begin(), extension.end(), extension.begin(),
                    [](unsigned char c) { return static_cast<char>(std::tolower(c)); });
-    return extension == ".aif" || extension == ".aiff" || extension == ".caf";
+    return std::ranges::find(kExtensions, extension) != std::end(kExtensions);
 }
 
 // As it is, which programs want; a terminal must not take part of a name for a command.
@@ -88,7 +89,7 @@ std::vector<std::string> cells(const LoopTags& tags, std::initializer_list<const
 {
     std::vector<std::string> row;
     for (const char* name : names)
-        row.push_back(tagText(tags, name));
+        row.push_back(name == std::string_view("key") ? keyWords(tags) : tagText(tags, name));
     return row;
 }
 

@@ -19,9 +19,11 @@ struct ScanRecord {
     std::vector<std::string> cells; // of a loop in a table
 };
 
-/// Reads one file. A loop is an AIFF or CAF file that has loop tags, transients or another loop chunk. Bad is what
-/// cannot be read, but of the files that hold no known audio, and of links to nothing, only those that are called so
-/// (".aif", ".aiff", ".caf"). Throws nothing.
+/// Reads one file. A loop is an AIFF or CAF file that has loop tags, transients or another loop chunk, and one of
+/// these, AIFC or WAVE that other programs' chunks call a loop (SamplerTags::describeLoop). Bad is what cannot be read,
+/// but of the files that hold no known audio, and of links to nothing, only those that are called so (".wav", ".aif",
+/// ".aiff",
+/// ".aifc", ".caf"). Throws nothing.
 ScanRecord scanFile(const FoundFile& file, ScanForm form);
 
 /// Writes the records of the loops, and in JSON those of bad files.

@@ -49,8 +49,9 @@ private:
                       color_ ? "\x1b[0m" : "", loopContainerName(tags.fileType));
         const auto lines = tagLines(tags);
         for (const TagLine& line : lines)
-            output_.print("  {:<{}}  {}{}\n", line.label, kLabelWidth, line.brief,
-                          line.name == std::string_view("tempo") ? " BPM" : "");
+            output_.print("  {:<{}}  {}{}{}\n", line.label, kLabelWidth, line.brief,
+                          line.name == std::string_view("tempo") ? " BPM" : "",
+                          line.source.empty() ? "" : fmt::format("  [{}]", line.source));
         if (lines.empty())
             output_.print("  no loop tags\n");
     }

@@ -146,8 +146,16 @@ void tellOfUnreadable(const RawLoopTags& before, const std::vector<TagAssignment
     }
 }
 
+void refuseOtherKinds(const LoopTags& tags)
+{
+    if (tags.fileType != kAIFF && tags.fileType != kCaff)
+        throw Failure(fmt::format("is {} {} file; tags are set and removed in AIFF and CAF files only",
+                                  tags.fileType == kAIFC ? "an" : "a", loopContainerName(tags.fileType)));
+}
+
 TagsPlan planAssignments(const LoopTags& before, const std::string& path, std::vector<TagAssignment> assignments)
 {
+    refuseOtherKinds(before);
     VireoLoopChunksManager manager = openLoopFile(path, platform::AudioFile::Permission::read);
     const RawLoopTags bytes = readRawLoopTags(manager);
     TagsPlan plan;
@@ -183,6 +191,7 @@ TagsPlan planAssignments(const LoopTags& before, const std::string& path, std::v
 
 TagsPlan planRemoval(const LoopTags& before, const std::string& path)
 {
+    refuseOtherKinds(before);
     TagsPlan plan;
     plan.after.fileType = before.fileType;
     plan.after.sampleRate = before.sampleRate;

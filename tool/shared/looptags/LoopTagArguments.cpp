@@ -188,8 +188,9 @@ void refuseShown(std::string_view key, std::string_view text)
         refuse(fmt::format("{}={}: the tempo follows from beats, length and sample rate; set beats=N instead, where N "
                            "is the tempo times the seconds of the sound, by 60",
                            key, printable(text)));
-    if (equalIgnoringASCIICase(key, "chunks"))
-        refuse("chunks cannot be set; tags copy carries them from one file to another");
+    for (const std::string_view shown : {"chunks", "loops", "markers"})
+        if (equalIgnoringASCIICase(key, shown))
+            refuse(fmt::format("{} cannot be set; tags copy carries what belongs to a loop to another file", shown));
 }
 
 // The parts of a key by the fields that they are for: a note, with a mode behind it or without, or a mode alone.
@@ -252,6 +253,15 @@ bool isUTF8(const Value& value)
            (list == nullptr || std::ranges::all_of(*list, isUTF8));
 }
 
+// Notes by which a key may be called: "C" is one for 48, and 60 says more of which it is.
+bool isSameNote(const TagAssignment& a, const TagAssignment& b)
+{
+    const auto* const first = a.value.get<std::int64_t>();
+    const auto* const second = b.value.get<std::int64_t>();
+    return a.field->name == std::string_view("midiRootNote") && first != nullptr && second != nullptr && *first > 0 &&
+           *second > 0 && (*first - *second) % 12 == 0;
+}
+
 // JSON has a key in words and in numbers, which may both be given.
 void assign(std::vector<TagAssignment>& assignments, std::string_view key, std::string_view text)
 {
@@ -261,6 +271,8 @@ void assign(std::vector<TagAssignment>& assignments, std::string_view key, std::
         const auto earlier = std::ranges::find(assignments, part.field, &TagAssignment::field);
         if (earlier == assignments.end())
             assignments.push_back(std::move(part));
+        else if (isSameNote(*earlier, part))
+            earlier->value = isWord(key, "key") ? earlier->value : part.value;
         else if (earlier->value != part.value)
             refuse(fmt::format("{} is set twice, to different values", part.field->name));
     }

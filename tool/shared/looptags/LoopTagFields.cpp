@@ -76,6 +76,12 @@ std::string noteName(std::int64_t note)
     return name.empty() ? std::to_string(note) : std::string(name);
 }
 
+std::string keyName(std::int64_t note)
+{
+    constexpr std::int64_t octave = 12, lowestNamed = 48;
+    return note < 1 || note > 127 ? "" : std::string(VireoLoopNoteName(lowestNamed + note % octave));
+}
+
 std::string modeName(std::int64_t keyType)
 {
     const std::string_view name = VireoLoopModeName(keyType);

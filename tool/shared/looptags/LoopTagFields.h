@@ -32,6 +32,8 @@ std::vector<const TagField*> fieldsForKey(std::string_view key);
 
 /// "C" to "B" for MIDI notes 48 to 59, the number for others.
 std::string noteName(std::int64_t note);
+/// "C" to "B" for MIDI notes of every octave, 1 to 127; empty for others.
+std::string keyName(std::int64_t note);
 /// "none", "minor", "major", "neither", "both"; the number for others.
 std::string modeName(std::int64_t keyType);
 /// The id by which people know a chunk that is carried without being interpreted.

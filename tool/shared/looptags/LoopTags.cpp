@@ -1,11 +1,8 @@
 #include "tool/shared/looptags/LoopTags.h"
 
-#include "audiofile/CAudioFileIO.h"
 #include "loops/VireoLoopTerms.h"
-#include "loops/VireoLoopUserDataUtils.h"
 #include "media/containers/ContainerHeaders.h"
 #include "tool/shared/arguments/QuotedText.h"
-#include "tool/shared/input/InputFile.h"
 #include "tool/shared/looptags/LoopTagFields.h"
 #include "tool/shared/output/JsonWriter.h"
 #include "tool/shared/output/Output.h"
@@ -13,68 +10,8 @@
 #include <algorithm>
 #include <cmath>
 #include <cstring>
-#include <filesystem>
-
-using platform::AudioFile;
 
 namespace {
-
-template <class Chunk>
-Chunk& addChunk(VireoLoopChunkList& list)
-{
-    auto chunk = std::make_unique<Chunk>();
-    Chunk& added = *chunk;
-    list.push_back(std::move(chunk));
-    return added;
-}
-
-void readLength(AudioFile& file, const std::string& path, LoopTags& tags)
-{
-    platform::StreamDescription format;
-    std::uint64_t packets = 0;
-    if (file.dataFormat(format) != kStatusOK || file.audioDataPacketCount(packets) != kStatusOK)
-        return;
-    tags.sampleRate = format.sampleRate;
-    tags.frames = packets * format.framesPerPacket;
-    CAudioFileIO description;
-    if (!format.isLinearPCM() && description.Open(referenceTo(path), 0) == kStatusOK)
-        tags.frames = static_cast<std::uint64_t>(description.Info().frames); // without what fills packets up
-}
-
-// The size of a chunk's body; none when the file does not have it.
-std::optional<std::uint32_t> sizeOf(const VireoLoopBaseChunk& chunk, AudioFile& file, FourCC fileType)
-{
-    const bool aiff = fileType == kAIFF;
-    if (aiff && chunk.aifChunkID() == 0)
-        return std::nullopt;
-    const bool byUUID = !aiff && chunk.cafChunkIsUUIDChunk();
-    const auto index = byUUID ? VireoLoopUUIDUserDataUtils::find(file, *chunk.cafChunkUUID()) : 0;
-    std::uint32_t size = 0;
-    if (!index || file.userDataSize(aiff ? chunk.aifChunkID() : chunk.cafChunkID(), *index, size) != kStatusOK)
-        return std::nullopt;
-    return byUUID ? size - static_cast<std::uint32_t>(tagging::kUUIDSize) : size;
-}
-
-// An empty chunk of each kind that is carried as it is.
-VireoLoopChunkList carriedKinds()
-{
-    VireoLoopChunkList kinds = VireoLoopChunks::Empty();
-    std::erase_if(kinds, [](const auto& chunk) {
-        return dynamic_cast<const VireoLoopGenericChunkData*>(&chunk->chunkData()) == nullptr ||
-               dynamic_cast<const VireoLoopCombinedTagsChunkData*>(&chunk->chunkData()) != nullptr;
-    });
-    return kinds;
-}
-
-std::vector<LoopTags::Chunk> carriedChunks(AudioFile& file, FourCC fileType)
-{
-    static const VireoLoopChunkList kinds = carriedKinds(); // never changed: the threads of a scan share it
-    std::vector<LoopTags::Chunk> found;
-    for (const auto& chunk : kinds)
-        if (const auto size = sizeOf(*chunk, file, fileType))
-            found.push_back({carriedChunkName(*chunk), *size});
-    return found;
-}
 
 std::string keyText(const LoopTags& tags)
 {
@@ -87,6 +24,15 @@ std::string keyText(const LoopTags& tags)
     if (note == 0)
         return mode;
     return noteName(note) + (mode.empty() ? "" : " " + mode);
+}
+
+// Notes of other octaves have the same names; which one it is stands behind.
+std::string keyInWords(const LoopTags& tags)
+{
+    const std::string words = keyWords(tags);
+    return words == keyText(tags)
+               ? words
+               : fmt::format("{} (note {})", words, tags.number(VireoLoopCombinedTagsChunkDataMidiRootNoteKey));
 }
 
 std::string signatureText(const LoopTags& tags)
@@ -150,6 +96,43 @@ std::string transientsText(const LoopTags& tags)
     return text;
 }
 
+const char* kindOf(const SamplerTags::Loop& loop)
+{
+    constexpr const char* kinds[] = {"forward", "alternating", "backward", "other"};
+    return kinds[static_cast<std::size_t>(loop.kind)];
+}
+
+// "0-44099,50000-60000".
+std::string loopsText(const LoopTags& tags)
+{
+    std::string text;
+    for (const SamplerTags::Loop& loop : tags.sampler.loops)
+        text += fmt::format("{}{}-{}", text.empty() ? "" : ",", loop.firstFrame, loop.lastFrame);
+    return text;
+}
+
+// "frames 0 to 44099, alternating" of one, the number of several.
+std::string loopsInWords(const LoopTags& tags)
+{
+    const auto& loops = tags.sampler.loops;
+    if (loops.size() != 1)
+        return numberText(std::ssize(loops));
+    const SamplerTags::Loop& loop = loops.front();
+    return fmt::format("frames {} to {}{}{}", loop.firstFrame, loop.lastFrame,
+                       loop.kind == SamplerTags::Loop::Kind::forward ? "" : ", ",
+                       loop.kind == SamplerTags::Loop::Kind::forward ? "" : kindOf(loop));
+}
+
+// Frames, each with its name.
+std::string markersText(const LoopTags& tags)
+{
+    std::string text;
+    for (const SamplerTags::Marker& marker : tags.sampler.markers)
+        text += fmt::format("{}{}{}{}", text.empty() ? "" : ", ", marker.frame, marker.name.empty() ? "" : " ",
+                            quotedText(marker.name, ","));
+    return text;
+}
+
 template <const char* const& key>
 std::string text(const LoopTags& tags)
 {
@@ -167,7 +150,7 @@ const ShownTag kShownTags[] = {
     {"tempo", "Tempo", tempoText},
     {"beatCount", "Beats",
      [](const LoopTags& tags) { return numberText(tags.number(VireoLoopCombinedTagsChunkDataBeatCountKey)); }},
-    {"key", "Key", keyText},
+    {"key", "Key", keyText, keyInWords},
     {"signature", "Signature", signatureText},
     {"signatureTop", "signatureTop", aloneText<VireoLoopCombinedTagsChunkDataSignatureTopKey>},
     {"signatureBottom", "signatureBottom", aloneText<VireoLoopCombinedTagsChunkDataSignatureBottomKey>},
@@ -182,8 +165,55 @@ const ShownTag kShownTags[] = {
     {"comments", "Comments", text<VireoLoopFileInfoChunkDataCommentsKey>},
     {"transients", "Transients", transientsText,
      [](const LoopTags& tags) { return numberText(std::ssize(tags.transients)); }},
+    {"loops", "Loop points", loopsText, loopsInWords},
+    {"markers", "Markers", markersText,
+     [](const LoopTags& tags) { return numberText(std::ssize(tags.sampler.markers)); }},
     {"chunks", "Chunks", chunksText},
 };
+
+void writeSamplerLists(JsonWriter& json, const SamplerTags& sampler)
+{
+    if (!sampler.loops.empty()) {
+        json.key("loops").beginArray();
+        for (const SamplerTags::Loop& loop : sampler.loops) {
+            json.beginObject().member("firstFrame", loop.firstFrame).member("lastFrame", loop.lastFrame);
+            json.member("kind", kindOf(loop));
+            if (loop.playCount > 0)
+                json.member("playCount", loop.playCount);
+            json.member("source", fourCCText(loop.source)).endObject();
+        }
+        json.endArray();
+    }
+    if (!sampler.markers.empty()) {
+        json.key("markers").beginArray();
+        for (const SamplerTags::Marker& marker : sampler.markers) {
+            json.beginObject().member("frame", marker.frame);
+            if (marker.frames > 0)
+                json.member("frames", marker.frames);
+            if (!marker.name.empty())
+                json.member("name", marker.name);
+            json.member("source", fourCCText(marker.source)).endObject();
+        }
+        json.endArray();
+    }
+}
+
+// Of what is made of several values, where the first one comes from. Nothing is said of loop chunks, which are the rule
+// in AIFF and CAF files.
+std::string sourceOf(const LoopTags& tags, std::string_view name)
+{
+    std::string source;
+    const auto found = tags.sources.find(name == "key" ? "midiRootNote" : name == "signature" ? "signatureTop" : name);
+    if (name == "loops" && !tags.sampler.loops.empty())
+        source = fourCCText(tags.sampler.loops.front().source);
+    else if (name == "markers" && !tags.sampler.markers.empty())
+        source = fourCCText(tags.sampler.markers.front().source);
+    else if (found != tags.sources.end())
+        source = found->second;
+    const bool holdsLoopChunks = tags.fileType == kAIFF || tags.fileType == kCaff;
+    const std::string shown = source.substr(0, source.find_last_not_of(' ') + 1);
+    return holdsLoopChunks && source != "INST" && source != "MARK" ? "" : shown;
+}
 
 } // namespace
 
@@ -203,73 +233,30 @@ std::string LoopTags::text(std::string_view key) const
 
 double LoopTags::tempo() const
 {
+    if (statedTempo > 0)
+        return statedTempo;
     return VireoLoopTempo(number(VireoLoopCombinedTagsChunkDataBeatCountKey), frames, sampleRate);
 }
 
-const char* loopContainerName(FourCC fileType)
+std::string loopContainerName(FourCC fileType)
 {
-    return fileType == kAIFF ? "AIFF" : "CAF";
+    switch (fileType) {
+    case kCaff:
+        return "CAF";
+    case fourCC("RIFX"): // big-endian
+        return "WAVE";
+    case fourCC("W64f"):
+        return "Wave64";
+    default:
+        return fourCCText(fileType);
+    }
 }
 
-VireoLoopChunksManager openLoopFile(const std::string& path, AudioFile::Permission permission)
+std::string keyWords(const LoopTags& tags)
 {
-    std::error_code error;
-    const std::string absolute = path.starts_with('/') ? path : std::filesystem::absolute(path, error).string();
-    const platform::String location = platform::String::fromFileSystemRepresentation(absolute.c_str());
-    if (location.isNull())
-        throw Failure("its path is not valid UTF-8");
-    VireoLoopChunksManager manager(platform::URL::createWithFileSystemPath(location, platform::PathStyle::posix, false),
-                                   permission);
-    if (manager.status() != kStatusOK)
-        requireRegularFile(path); // says best what is wrong with it
-    if (manager.status() == kStatusParameterError)
-        throw OtherKind("is no AIFF or CAF file", OtherKind::Kind::unknown);
-    requireOK(manager.status());
-    const FourCC type = manager.audioFileTypeID();
-    if (type != kAIFF && type != kCaff)
-        throw OtherKind(fmt::format("is {} file; only AIFF and CAF files hold loop tags",
-                                    type == kWAVE ? "a WAVE" : "an " + fourCCText(type)),
-                        OtherKind::Kind::audio);
-    return manager;
-}
-
-std::vector<LoopTags::Chunk> loopChunksOf(VireoLoopChunksManager& manager)
-{
-    AudioFile& file = *manager.audioFile();
-    const bool aiff = manager.audioFileTypeID() == kAIFF;
-    std::vector<LoopTags::Chunk> found = carriedChunks(file, manager.audioFileTypeID());
-    for (const std::unique_ptr<VireoLoopBaseChunk>& chunk : VireoLoopChunks::Empty())
-        if (chunk->aifChunkID() == tagging::kBasicTagging || chunk->aifChunkID() == tagging::kTransients)
-            if (const auto size = sizeOf(*chunk, file, manager.audioFileTypeID()))
-                found.push_back({carriedChunkName(*chunk), *size});
-    std::uint32_t size = 0;
-    for (const FourCC id : {tagging::kCategories, fourCC("NAME"), fourCC("AUTH"), fourCC("(c) "), fourCC("COMT")})
-        if (aiff && file.userDataSize(id, 0, size) == kStatusOK)
-            found.push_back({fourCCText(id), size});
-    platform::Dictionary information;
-    if (!aiff && file.information(information) == kStatusOK)
-        for (const char* key : {"title", "artist", "copyright", "comments"})
-            if (const auto* text = platform::find<std::string>(information, key))
-                found.push_back({key, static_cast<std::uint32_t>(text->size())});
-    return found;
-}
-
-LoopTags readLoopTags(const std::string& path)
-{
-    VireoLoopChunksManager manager = openLoopFile(path, AudioFile::Permission::read);
-    VireoLoopChunkList list;
-    auto& info = addChunk<VireoLoopFileInfoChunk>(list);
-    auto& combined = addChunk<VireoLoopCombinedTaggingChunk>(list);
-    auto& transients = addChunk<VireoLoopTransientChunk>(list);
-    manager.readChunks(list);
-    LoopTags tags;
-    tags.fileType = manager.audioFileTypeID();
-    tags.info = std::move(info.fileInfo()).dataDictionary();
-    tags.combined = std::move(combined.tags()).dataDictionary();
-    tags.transients = transients.transients().transients();
-    readLength(*manager.audioFile(), path, tags);
-    tags.chunks = carriedChunks(*manager.audioFile(), tags.fileType);
-    return tags;
+    const std::int64_t note = tags.number(VireoLoopCombinedTagsChunkDataMidiRootNoteKey);
+    const std::string name = keyName(note), text = keyText(tags);
+    return name.empty() ? text : name + text.substr(noteName(note).size());
 }
 
 std::vector<TagLine> tagLines(const LoopTags& tags)
@@ -277,7 +264,8 @@ std::vector<TagLine> tagLines(const LoopTags& tags)
     std::vector<TagLine> lines;
     for (const ShownTag& shown : kShownTags)
         if (std::string text = shown.text(tags); !text.empty())
-            lines.push_back({shown.name, shown.label, text, shown.brief != nullptr ? shown.brief(tags) : text});
+            lines.push_back({shown.name, shown.label, text, shown.brief != nullptr ? shown.brief(tags) : text,
+                             sourceOf(tags, shown.name)});
     return lines;
 }
 
@@ -325,12 +313,12 @@ std::vector<TagValue> tagRecord(const LoopTags& tags)
     }
     for (TagValue& tag : tagValues(tags)) {
         const auto* const number = tag.value.get<std::int64_t>();
-        const std::string_view note = tag.name == "midiRootNote" && number ? VireoLoopNoteName(*number) : "";
+        const std::string note = tag.name == "midiRootNote" && number ? keyName(*number) : "";
         const std::string_view mode = tag.name == "keyType" && number ? VireoLoopModeName(*number) : "";
         const bool endsSignature = tag.name == "signatureBottom" && !signatureText(tags).empty();
         record.push_back(std::move(tag));
         if (!note.empty())
-            record.push_back({"key", std::string(note)});
+            record.push_back({"key", note});
         if (!mode.empty())
             record.push_back({"mode", std::string(mode)});
         if (endsSignature)
@@ -350,6 +338,13 @@ void writeLoopTags(JsonWriter& json, const std::string& path, const LoopTags& ta
             json.beginObject().member("id", chunk.id).member("size", chunk.size).endObject();
         json.endArray();
     }
+    if (!tags.sources.empty()) {
+        json.key("sources").beginObject();
+        for (const auto& [name, chunk] : tags.sources)
+            json.member(name, chunk);
+        json.endObject();
+    }
+    writeSamplerLists(json, tags.sampler);
     if (!tags.transients.empty()) { // there may be millions
         json.key("transients").beginArray();
         for (const VireoLoopTransient& transient : tags.transients)

@@ -1,11 +1,14 @@
-// The loop tags of one AIFF or CAF file, as the verbs show, compare and change them.
+// The loop tags of one file, as the verbs show, compare and change them: of the loop chunks of AIFF and CAF files, and
+// of what the chunks of samplers say in WAVE and AIFF.
 #pragma once
 
+#include "loops/SamplerTags.h"
 #include "loops/VireoLoopChunksManager.h"
 #include "platform/core/Value.h"
 #include "tool/shared/output/Failure.h"
 
 #include <cstdint>
+#include <map>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -20,28 +23,39 @@ struct LoopTags {
         std::uint32_t size = 0;
     };
 
-    FourCC fileType = 0; // "AIFF" or "caff"
+    FourCC fileType = 0; // "AIFF", "AIFC", "caff", "WAVE", "RIFX" or "W64f"
     double sampleRate = 0;
     std::uint64_t frames = 0;
     platform::Dictionary combined; // under the VireoLoopCombinedTagsChunkData keys
     platform::Dictionary info;     // under the VireoLoopFileInfoChunkData keys
     std::vector<VireoLoopTransient> transients;
     std::vector<Chunk> chunks;
+    bool hasLoopChunks = false; // of this library's kind
+    SamplerTags sampler;        // what it says stands in the dictionaries too, where the loop chunks say nothing
+    double statedTempo = 0;     // in beats per minute, of a chunk that says it
+    std::map<std::string, std::string, std::less<>> sources; // by the names of tags, the chunks that they come from
 
     /// The number or text under a key of either dictionary; 0 or "" when there is none.
     std::int64_t number(std::string_view key) const;
     std::string text(std::string_view key) const;
-    /// Beats per minute; 0 when beats, frames or rate are not known.
+    /// Beats per minute, as stated, or from the beats; 0 when neither is known.
     double tempo() const;
-    /// Whether any chunk of a loop is there; texts such as a title, which any file may have, do not make one.
-    bool isLoop() const { return !combined.empty() || !transients.empty() || !chunks.empty(); }
+    /// Whether any loop chunk is there, or the chunks of samplers describe a loop; texts such as a title, which any
+    /// file may have, do not make one.
+    bool isLoop() const { return hasLoopChunks || sampler.describeLoop(frames); }
+    bool isEmpty() const { return combined.empty() && info.empty() && transients.empty() && chunks.empty(); }
 };
 
-/// Opens a file that can hold loop tags; throws Failure, for another OtherKind.
+/// Opens a file that can hold loop chunks; throws Failure, for another OtherKind.
 VireoLoopChunksManager openLoopFile(const std::string& path, platform::AudioFile::Permission permission);
 
-/// Reads them, and of the chunks that are not interpreted only the sizes. Throws Failure.
+/// Reads all that is known of a file as a loop, and of the chunks that are not interpreted only the sizes. Throws
+/// Failure, for a file of another kind OtherKind.
 LoopTags readLoopTags(const std::string& path);
+/// The same for edits: of AIFF and CAF files the loop chunks alone, of WAVE what its own chunks say.
+LoopTags readOwnLoopTags(const std::string& path);
+/// What `sampler` says, where the tags say nothing yet.
+void addSamplerTags(LoopTags& tags, SamplerTags sampler);
 
 /// The chunks of an open file that hold loop tags or are carried, whether they can be read or not.
 std::vector<LoopTags::Chunk> loopChunksOf(VireoLoopChunksManager& manager);
@@ -50,16 +64,20 @@ std::vector<LoopTags::Chunk> loopChunksOf(VireoLoopChunksManager& manager);
 struct TagLine {
     const char* name;
     const char* label;
-    std::string text;  // in one line, as `tags set` takes it back
-    std::string brief; // for people
+    std::string text;   // in one line, as `tags set` takes it back
+    std::string brief;  // for people
+    std::string source; // the chunk that says it, where that is none of the loop chunks
 };
 /// What is known of the tags, in a musician's order.
 std::vector<TagLine> tagLines(const LoopTags& tags);
 /// The text of one tag by its name, which must be one of theirs, in one line.
 std::string tagText(const LoopTags& tags, const char* name);
 
-/// "AIFF" or "CAF".
-const char* loopContainerName(FourCC fileType);
+/// The root note by its name, in whatever octave, and the mode.
+std::string keyWords(const LoopTags& tags);
+
+/// "AIFF", "CAF", "WAVE".
+std::string loopContainerName(FourCC fileType);
 
 /// A tag by the name that JSON has for it: a number, a text or a list.
 struct TagValue {

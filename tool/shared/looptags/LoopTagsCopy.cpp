@@ -99,7 +99,7 @@ bool writeCarried(VireoLoopChunksManager& manager, const LoopSource& source, con
 std::shared_ptr<LoopSource> readLoopSource(const std::string& path)
 {
     auto source = std::make_shared<LoopSource>();
-    source->tags = readLoopTags(path);
+    source->tags = readOwnLoopTags(path);
     VireoLoopChunksManager manager = openLoopFile(path, platform::AudioFile::Permission::read);
     manager.readChunks(source->chunks);
     source->bytes = readRawLoopTags(manager);

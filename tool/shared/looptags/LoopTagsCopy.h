@@ -14,7 +14,7 @@ struct LoopSource {
     RawLoopTags bytes;
     VireoLoopChunkList chunks = VireoLoopChunks::Empty();
 
-    bool isEmpty() const { return !tags.isLoop() && tags.info.empty(); }
+    bool isEmpty() const { return tags.isEmpty(); }
 };
 
 /// Throws Failure.

@@ -147,7 +147,7 @@ private:
 void editFile(const std::string& path, const TagsEditor& editor, const EditOptions& options, EditReport& report)
 {
     SafeEdit edit(path, options);
-    const TagsPlan plan = editor.plan(readLoopTags(edit.target()), edit.target());
+    const TagsPlan plan = editor.plan(readOwnLoopTags(edit.target()), edit.target());
     std::string backup;
     if (!options.dryRun && !plan.changes.empty())
         backup = edit.apply(EditScope::ofLoopTags(), [&](const std::string& copy) { writeTags(copy, plan); });
@@ -179,7 +179,7 @@ void writeTags(const std::string& path, const TagsPlan& plan)
     VireoLoopChunksManager manager = openLoopFile(path, platform::AudioFile::Permission::read);
     if (readRawLoopTags(manager) != plan.bytes)
         throw Failure("the tags are not found as they should be after the edit");
-    if (const auto wrong = differences(readLoopTags(path), plan.after); !wrong.empty())
+    if (const auto wrong = differences(readOwnLoopTags(path), plan.after); !wrong.empty())
         throw Failure("the tags are not found as they should be after the edit: " + wrong.front().key);
 }
 
@@ -192,7 +192,7 @@ bool editTags(const FileArguments& named, const TagsEditor& editor, EditOptions 
     for (const std::string& path : files)
         try {
             const FileAccess access = accessForReading(path, edit.waiting());
-            editor.plan(readLoopTags(path), path);
+            editor.plan(readOwnLoopTags(path), path);
         } catch (const Failure&) { // reported when its turn comes
         }
     EditReport report(editor, edit, output);

@@ -1,0 +1,247 @@
+// What a file is read by, and which of its chunks say what.
+#include "audiofile/CAudioFileIO.h"
+#include "loops/VireoLoopUserDataUtils.h"
+#include "media/containers/ContainerHeaders.h"
+#include "tool/shared/input/InputFile.h"
+#include "tool/shared/looptags/LoopTagFields.h"
+#include "tool/shared/looptags/LoopTags.h"
+
+#include <fmt/format.h>
+
+#include <algorithm>
+#include <filesystem>
+
+using platform::AudioFile;
+
+namespace {
+
+template <class Chunk>
+Chunk& addChunk(VireoLoopChunkList& list)
+{
+    auto chunk = std::make_unique<Chunk>();
+    Chunk& added = *chunk;
+    list.push_back(std::move(chunk));
+    return added;
+}
+
+void readLength(AudioFile& file, const std::string& path, LoopTags& tags)
+{
+    platform::StreamDescription format;
+    std::uint64_t packets = 0;
+    if (file.dataFormat(format) != kStatusOK || file.audioDataPacketCount(packets) != kStatusOK)
+        return;
+    tags.sampleRate = format.sampleRate;
+    tags.frames = packets * format.framesPerPacket;
+    CAudioFileIO description;
+    if (!format.isLinearPCM() && description.Open(referenceTo(path), 0) == kStatusOK)
+        tags.frames = static_cast<std::uint64_t>(description.Info().frames); // without what fills packets up
+}
+
+// The size of a chunk's body; none when the file does not have it.
+std::optional<std::uint32_t> sizeOf(const VireoLoopBaseChunk& chunk, AudioFile& file, FourCC fileType)
+{
+    const bool aiff = fileType == kAIFF;
+    if (aiff && chunk.aifChunkID() == 0)
+        return std::nullopt;
+    const bool byUUID = !aiff && chunk.cafChunkIsUUIDChunk();
+    const auto index = byUUID ? VireoLoopUUIDUserDataUtils::find(file, *chunk.cafChunkUUID()) : 0;
+    std::uint32_t size = 0;
+    if (!index || file.userDataSize(aiff ? chunk.aifChunkID() : chunk.cafChunkID(), *index, size) != kStatusOK)
+        return std::nullopt;
+    return byUUID ? size - static_cast<std::uint32_t>(tagging::kUUIDSize) : size;
+}
+
+// An empty chunk of each kind that is carried as it is.
+VireoLoopChunkList carriedKinds()
+{
+    VireoLoopChunkList kinds = VireoLoopChunks::Empty();
+    std::erase_if(kinds, [](const auto& chunk) {
+        return dynamic_cast<const VireoLoopGenericChunkData*>(&chunk->chunkData()) == nullptr ||
+               dynamic_cast<const VireoLoopCombinedTagsChunkData*>(&chunk->chunkData()) != nullptr;
+    });
+    return kinds;
+}
+
+std::vector<LoopTags::Chunk> carriedChunks(AudioFile& file, FourCC fileType)
+{
+    static const VireoLoopChunkList kinds = carriedKinds(); // never changed: the threads of a scan share it
+    std::vector<LoopTags::Chunk> found;
+    for (const auto& chunk : kinds)
+        if (const auto size = sizeOf(*chunk, file, fileType))
+            found.push_back({carriedChunkName(*chunk), *size});
+    return found;
+}
+
+platform::URLRef urlOf(const std::string& path)
+{
+    std::error_code error;
+    const std::string absolute = path.starts_with('/') ? path : std::filesystem::absolute(path, error).string();
+    const platform::String location = platform::String::fromFileSystemRepresentation(absolute.c_str());
+    if (location.isNull())
+        throw Failure("its path is not valid UTF-8");
+    return platform::URL::createWithFileSystemPath(location, platform::PathStyle::posix, false);
+}
+
+void requireOpen(std::int32_t status, const std::string& path)
+{
+    if (status != kStatusOK)
+        requireRegularFile(path); // says best what is wrong with it
+    if (status == kStatusParameterError)
+        throw OtherKind("is no WAVE, AIFF or CAF file", OtherKind::Kind::unknown);
+    requireOK(status);
+}
+
+struct TextField {
+    SamplerTags::Text::Kind kind;
+    const char* name;
+    const char* key;
+};
+const TextField kTexts[] = {
+    {SamplerTags::Text::Kind::title, "title", VireoLoopFileInfoChunkDataTitleKey},
+    {SamplerTags::Text::Kind::artist, "artist", VireoLoopFileInfoChunkDataArtistKey},
+    {SamplerTags::Text::Kind::copyright, "copyright", VireoLoopFileInfoChunkDataCopyrightKey},
+    {SamplerTags::Text::Kind::comments, "comments", VireoLoopFileInfoChunkDataCommentsKey},
+    {SamplerTags::Text::Kind::genre, "genre", VireoLoopCombinedTagsChunkDataGenreKey},
+};
+
+// The loop chunks of AIFF and CAF files.
+void readLoopChunks(VireoLoopChunksManager& manager, LoopTags& tags)
+{
+    VireoLoopChunkList list;
+    auto& info = addChunk<VireoLoopFileInfoChunk>(list);
+    auto& combined = addChunk<VireoLoopCombinedTaggingChunk>(list);
+    auto& transients = addChunk<VireoLoopTransientChunk>(list);
+    manager.readChunks(list);
+    tags.info = std::move(info.fileInfo()).dataDictionary();
+    tags.combined = std::move(combined.tags()).dataDictionary();
+    tags.transients = transients.transients().transients();
+    tags.chunks = carriedChunks(*manager.audioFile(), tags.fileType);
+    tags.hasLoopChunks = !tags.combined.empty() || !tags.transients.empty() || !tags.chunks.empty();
+}
+
+// By the AIFF ids in either kind of file; texts of CAF stand in "info".
+void nameLoopChunks(LoopTags& tags)
+{
+    constexpr std::string_view inCategories[] = {"instrumentType", "instrumentSubType", "genre", "descriptors"};
+    constexpr std::pair<std::string_view, const char*> texts[] = {
+        {"title", "NAME"}, {"artist", "AUTH"}, {"copyright", "(c) "}, {"comments", "COMT"}};
+    for (const TagValue& tag : tagValues(tags)) {
+        const auto* const text = std::ranges::find(texts, tag.name, [](const auto& each) { return each.first; });
+        tags.sources[tag.name] =
+            text != std::end(texts) ? tags.fileType == kAIFF ? text->second : "info"
+            : tags.fileType == kAIFF && std::ranges::find(inCategories, tag.name) != std::end(inCategories) ? "cate"
+                                                                                                            : "basc";
+    }
+    if (!tags.transients.empty())
+        tags.sources["transients"] = "trns";
+}
+
+std::string sourceName(FourCC id)
+{
+    return id == fourCC("INFO") || id == fourCC("adtl") ? "LIST " + fourCCText(id) : fourCCText(id);
+}
+
+LoopTags readTags(const std::string& path, bool withSamplers)
+{
+    std::int32_t status = kStatusOK;
+    auto opened = AudioFile::openToRead(*urlOf(path), &status);
+    requireOpen(status, path);
+    VireoLoopChunksManager manager(std::move(opened));
+    AudioFile& file = *manager.audioFile();
+    LoopTags tags;
+    tags.fileType = manager.audioFileTypeID();
+    const bool holdsLoopChunks = tags.fileType == kAIFF || tags.fileType == kCaff;
+    if (tags.fileType == fourCC("NeXT"))
+        throw OtherKind("is an AU file; those hold no tags", OtherKind::Kind::audio);
+    readLength(file, path, tags);
+    if (holdsLoopChunks) {
+        readLoopChunks(manager, tags);
+        nameLoopChunks(tags);
+    }
+    if (withSamplers || !holdsLoopChunks) {
+        SamplerTags sampler;
+        requireOK(SamplerTags::read(file, sampler));
+        addSamplerTags(tags, std::move(sampler));
+    }
+    return tags;
+}
+
+} // namespace
+
+VireoLoopChunksManager openLoopFile(const std::string& path, AudioFile::Permission permission)
+{
+    VireoLoopChunksManager manager(urlOf(path), permission);
+    requireOpen(manager.status(), path);
+    const FourCC type = manager.audioFileTypeID();
+    if (type != kAIFF && type != kCaff)
+        throw OtherKind(fmt::format("is {} {} file; loop tags are put into AIFF and CAF files only",
+                                    type == kAIFC ? "an" : "a", loopContainerName(type)),
+                        OtherKind::Kind::audio);
+    return manager;
+}
+
+std::vector<LoopTags::Chunk> loopChunksOf(VireoLoopChunksManager& manager)
+{
+    AudioFile& file = *manager.audioFile();
+    const bool aiff = manager.audioFileTypeID() == kAIFF;
+    std::vector<LoopTags::Chunk> found = carriedChunks(file, manager.audioFileTypeID());
+    for (const std::unique_ptr<VireoLoopBaseChunk>& chunk : VireoLoopChunks::Empty())
+        if (chunk->aifChunkID() == tagging::kBasicTagging || chunk->aifChunkID() == tagging::kTransients)
+            if (const auto size = sizeOf(*chunk, file, manager.audioFileTypeID()))
+                found.push_back({carriedChunkName(*chunk), *size});
+    std::uint32_t size = 0;
+    for (const FourCC id : {tagging::kCategories, fourCC("NAME"), fourCC("AUTH"), fourCC("(c) "), fourCC("COMT")})
+        if (aiff && file.userDataSize(id, 0, size) == kStatusOK)
+            found.push_back({fourCCText(id), size});
+    platform::Dictionary information;
+    if (!aiff && file.information(information) == kStatusOK)
+        for (const char* key : {"title", "artist", "copyright", "comments"})
+            if (const auto* text = platform::find<std::string>(information, key))
+                found.push_back({key, static_cast<std::uint32_t>(text->size())});
+    return found;
+}
+
+LoopTags readLoopTags(const std::string& path)
+{
+    return readTags(path, true);
+}
+
+LoopTags readOwnLoopTags(const std::string& path)
+{
+    return readTags(path, false);
+}
+
+void addSamplerTags(LoopTags& tags, SamplerTags sampler)
+{
+    const bool knowsTempo = tags.tempo() > 0;
+    const auto add = [&](platform::Dictionary& to, const char* name, const char* key, platform::Value value,
+                         FourCC source) {
+        if (to.try_emplace(key, std::move(value)).second)
+            tags.sources[name] = sourceName(source);
+    };
+    const auto addNumber = [&](const auto& number, const char* name, const char* key) {
+        if (number && tags.number(key) == 0) {
+            tags.combined.erase(key);
+            add(tags.combined, name, key, number->value, number->source);
+        }
+    };
+    addNumber(sampler.beats, "beatCount", VireoLoopCombinedTagsChunkDataBeatCountKey);
+    addNumber(sampler.rootNote, "midiRootNote", VireoLoopCombinedTagsChunkDataMidiRootNoteKey);
+    addNumber(sampler.signatureTop, "signatureTop", VireoLoopCombinedTagsChunkDataSignatureTopKey);
+    addNumber(sampler.signatureBottom, "signatureBottom", VireoLoopCombinedTagsChunkDataSignatureBottomKey);
+    if (sampler.isLoop)
+        add(tags.combined, "loopFileType", VireoLoopCombinedTagsChunkDataFileTypeKey,
+            std::int64_t{sampler.isLoop->value ? 1 : 2}, sampler.isLoop->source);
+    if (sampler.tempo && !knowsTempo) {
+        tags.statedTempo = sampler.tempo->value;
+        tags.sources["tempo"] = sourceName(sampler.tempo->source);
+    } else if (tags.tempo() > 0 && !knowsTempo) {
+        tags.sources["tempo"] = sourceName(sampler.beats->source);
+    }
+    for (const SamplerTags::Text& text : sampler.texts)
+        for (const auto& [kind, name, key] : kTexts)
+            if (kind == text.kind)
+                add(kind == SamplerTags::Text::Kind::genre ? tags.combined : tags.info, name, key, text.text,
+                    text.source);
+    tags.sampler = std::move(sampler);
+}

@@ -34,7 +34,7 @@ _ktfiles()
     case $prev in
         --color) COMPREPLY=($(compgen -W 'auto always never' -- "$cur")); return ;;
         --coordination | --with) _filedir -d; return ;;
-        --files-from | --from | -o | --output | --png | --svg) _filedir; return ;;
+        --files-from | --from | -o | --output | --png | --svg | --sheet) _filedir; return ;;
         --sidecar) return ;;
         --colors) COMPREPLY=($(compgen -W 'night day amber rose ink' -- "$cur")); return ;;
         --width | --height | --start | --end | --alternative | --keep | --timeout) return ;;
@@ -61,7 +61,7 @@ _ktfiles()
             adm/*) COMPREPLY=($(compgen -W "--long --lenient --check --threads $files $common" -- "$cur")) ;;
             tags/set | tags/remove | tags/copy) COMPREPLY=($(compgen -W "$files $edit $common" -- "$cur")) ;;
             overview/*) COMPREPLY=($(compgen -W "--png --svg --width --height --start --end --frames --scale --colors
-                --channels --gain --scale-factor --format --output --frames-per-point --force --stored --store --threads $files $edit $common" -- "$cur")) ;;
+                --sheet --columns --channels --gain --scale-factor --format --output --frames-per-point --force --stored --store --threads $files $edit $common" -- "$cur")) ;;
             decode/*) COMPREPLY=($(compgen -W "--output --format --rate --channels --bits --start --end --frames --conceal
                 --force --threads $files $common" -- "$cur")) ;;
             lock/*) COMPREPLY=($(compgen -W "--read --write --presenter --timeout -- $common" -- "$cur")) ;;

@@ -179,5 +179,69 @@ class Size(Picture):
                          ["b.wav: drawn to b.png, 1200 x 480"])
 
 
+class Sheet(Picture):
+    CELL = (64 + 12, 30 + 18 + 12)
+    SIZE = ("--width", "64", "--height", "30")
+
+    def cells(self, name):
+        """What the cells of a sheet show: where they are, their title, and their texts."""
+        root = ElementTree.fromstring((self.folder / name).read_bytes())
+        return [((int(cell.get("x")), int(cell.get("y"))), cell.find(SVG + "title").text, [text.text for text in cell.iter(SVG + "text")])
+                for cell in root.findall(SVG + "svg")]
+
+    def test_every_file_has_its_cell(self):
+        (self.folder / "lib" / "sub").mkdir(parents=True)
+        loud = [32000, -32000] * 1000
+        for i in range(7):
+            self.write(f"lib/{i}.wav", pcm(loud if i % 2 else [0] * 2000))
+        self.write("lib/sub/x<&.wav", pcm(loud))
+        self.write("lib/none.wav", pcm([]))
+        self.write("lib/note.txt", b"text")
+        names = [f"{i}.wav" for i in range(7)] + ["none.wav", "sub/x<&.wav"]
+        for out, threads in (("a.svg", "1"), ("b.svg", "4"), ("a.png", "4")):
+            result = self.run_command("overview", "lib", "--sheet", out, "--columns", "4", *self.SIZE, "-j", threads, "--colors",
+                                      WhiteOnBlack.COLORS, status=1)
+            self.assertEqual(result.stdout.decode(), f"9 files drawn to {out}, {4 * 76 + 12} x {3 * 60 + 12}\n")
+            self.assertEqual(result.stderr.decode(), "ktfiles: lib/none.wav: holds no sound\n")
+        self.assertEqual((self.folder / "a.svg").read_bytes(), (self.folder / "b.svg").read_bytes())
+        cells = self.cells("a.svg")
+        self.assertEqual([cell[:2] for cell in cells], [((12 + i % 4 * 76, 12 + i // 4 * 60), name) for i, name in enumerate(names)])
+        self.assertEqual(cells[7][2][:2], ["none.wav", "holds"])
+        picture = WhiteOnBlack((self.folder / "a.png").read_bytes())
+        for i in range(9):
+            column = picture.column(12 + i % 4 * 76 + 32)[12 + i // 4 * 60:][:30]
+            if i != 7:
+                self.assertAlmostEqual(sum(column), 26 if i == 8 or i % 2 else 1, delta=1, msg=i)
+        record = self.json("overview", "lib/0.wav", "lib/none.wav", "--sheet", "c.png", status=1)
+        self.assertEqual([item.get("sheet") for item in record], ["c.png", None])
+
+    def test_names_fit_their_cells(self):
+        names = ["a very long name that says everything about itself.wav", "W" * 60 + ".wav", "太鼓" * 20 + ".wav", "é" * 3 + ".wav", "e\u0301\u0327o\u0308.wav"]
+        for name in names:
+            self.write(name, pcm([100] * 1000))
+        for width in ("16", "64", "200"):
+            self.run_command("overview", *names, "--sheet", "a.svg", "--force", "--width", width, "--height", "72")
+            self.run_command("overview", *names, "--sheet", "a.png", "--force", "--width", width, "--height", "72", "--columns", "5", "--colors", WhiteOnBlack.COLORS)
+            rows = decoded_png((self.folder / "a.png").read_bytes())
+            gaps = [x for i in range(6) for x in range(i * (int(width) + 12), i * (int(width) + 12) + 12)]
+            self.assertEqual([(x, y) for y, row in enumerate(rows) for x in gaps if row[x][0] > 120], [], width)
+        shown = [texts[-1] for _, _, texts in self.cells("a.svg")]
+        self.assertEqual([text.count("…") for text in shown], [1, 1, 1, 0, 0])
+        self.assertTrue(all(text.endswith(".wav") for text in shown), shown)
+
+    def test_mistakes_and_bounds(self):
+        audio = pcm([100] * 1000)
+        self.write("a.wav", audio)
+        for arguments in (("--sheet", "x.gif"), ("--sheet", "x.png", "--png", "y.png"), ("--columns", "2"), ("--sheet", "-"), ("--png", "x", "b.wav")):
+            self.run_command("overview", "a.wav", *arguments, status=2)
+        self.assertIn("is the most", self.failure("overview", *["a.wav"] * 9, "--sheet", "x.png", "--width", "16384", "--columns", "9"))
+        self.write("old.png", b"old")
+        self.assertIn("exists", self.failure("overview", "a.wav", "--sheet", "old.png"))
+        (self.folder / "l.png").symlink_to("a.wav")
+        self.assertIn("over a.wav", self.failure("overview", "a.wav", "--sheet", "l.png", "--force", status=2))
+        self.assertEqual((self.folder / "a.wav").read_bytes(), audio)
+        self.assert_no_litter("a.wav", "old.png", "l.png")
+
+
 if __name__ == "__main__":
     unittest.main()

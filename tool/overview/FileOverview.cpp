@@ -2,6 +2,7 @@
 
 #include "loops/overview/StoredOverview.h"
 #include "tool/shared/input/InputFile.h"
+#include "tool/shared/output/ClockTime.h"
 #include "tool/shared/output/Failure.h"
 #include "tool/shared/output/Progress.h"
 
@@ -57,4 +58,9 @@ Waveform FileOverview::waveform() const
     waveform.frames = fits ? info_.frames : OverviewFrames(*block_);
     waveform.sampleRate = sampleRateOf(info_);
     return waveform;
+}
+
+std::string FileOverview::duration() const
+{
+    return durationText(static_cast<double>(info_.frames) / sampleRateOf(info_));
 }

@@ -22,6 +22,8 @@ public:
 
     /// The points, which there must be, for as long as this lives.
     Waveform waveform() const;
+    /// For people.
+    std::string duration() const;
     KTMem& block() { return *block_; }
     const AudioFileInfo& info() const { return info_; }
 

@@ -153,6 +153,9 @@ constexpr LabelGlyph kMinus = glyph(3.8F, line(0, 3.8F, 3.8F, 3.8F));
 constexpr LabelGlyph kInfinity = glyph(7.2F, arc(2.3F, 3.8F, 1.6F, 1.8F), arc(5.6F, 3.8F, 1.6F, 1.8F));
 constexpr LabelGlyph kEllipsis = glyph(3.8F, dot(0.3F, 6.7F), dot(1.9F, 6.7F), dot(3.5F, 6.7F));
 
+constexpr LabelGlyph kSharpS = glyph(3.6F, line(0.1F, 7, 0.1F, 1.7F), arc(1.5F, 1.7F, 1.4F, 1.7F, 180, 400),
+                                     arc(1.6F, 5.1F, 1.9F, 1.9F, 270, 480));
+
 // From U+00C0 on, a letter and its mark each.
 constexpr std::string_view kLatin = "A`A'A^A~A:Ao..C,E`E'E^E:I`I'I^I:..N~O`O'O^O~O:..O/U`U'U^U:Y'...."
                                     "a`a'a^a~a:ao..c,e`e'e^e:i`i'i^i:..n~o`o'o^o~o:..o/u`u'u^u:y'..y:";
@@ -188,6 +191,8 @@ std::optional<LabelGlyph> labelGlyph(char32_t character)
             return markOn(kASCII[static_cast<unsigned char>(pair[0]) - ' '], pair[1], pair[0] >= 'a');
     }
     switch (character) {
+    case 0xDF:
+        return kSharpS;
     case 0x2212:
         return kMinus;
     case 0x221E:

@@ -1,5 +1,6 @@
 #include "tool/overview/OverviewArguments.h"
 
+#include "tool/overview/ContactSheet.h"
 #include "tool/shared/arguments/SoundRange.h"
 #include "tool/shared/arguments/ThreadsOption.h"
 
@@ -11,6 +12,7 @@ namespace {
 
 constexpr std::pair kWidths{16, 16384};
 constexpr std::pair kHeights{8, 4096};
+constexpr std::pair kColumns{1, 1000};
 constexpr std::pair kScaleFactors{1, 4};
 constexpr double kMostGain = 120; // decibels
 constexpr std::pair kFramesPerPoint{1, 1 << 24};
@@ -54,6 +56,11 @@ void addPictureOptions(Verb& verb, OverviewArguments& arguments)
 {
     CommandLine::addPath(verb, "--png", arguments.png, "Draw a PNG; \"-\" is standard output").label("OUT");
     CommandLine::addPath(verb, "--svg", arguments.svg, "Draw an SVG; \"-\" is standard output").label("OUT");
+    CommandLine::addPath(
+        verb, "--sheet", arguments.sheet,
+        "Draw all files on one sheet, a PNG or SVG by its name; --width and --height are those of each")
+        .label("OUT");
+    verb.addNumber("--columns", arguments.columns, kColumns, "Pictures side by side on the sheet");
     CommandLine::addForceOption(verb, arguments.existing);
     addSize(verb, "--width", arguments.picture.width, kWidths);
     addSize(verb, "--height", arguments.picture.height, kHeights);
@@ -142,14 +149,21 @@ void declareArguments(Verb& verb, OverviewArguments& arguments)
 
 void requireSense(const OverviewArguments& arguments, const Verb& verb, const OutputOptions& output)
 {
-    if (arguments.draws() && arguments.files.maybeSeveral())
-        throw UsageError("--png and --svg draw one file at a time");
+    const bool drawsOne = !arguments.png.empty() || !arguments.svg.empty();
+    if (drawsOne && arguments.files.maybeSeveral())
+        throw UsageError("--png and --svg draw one file at a time; --sheet draws them all");
+    if (drawsOne && !arguments.sheet.empty())
+        throw UsageError("--sheet draws all files, --png and --svg one");
+    if (!arguments.sheet.empty() && !sheetFormatOf(arguments.sheet))
+        throw UsageError("the name of a sheet ends with .png or .svg, which says what to write");
+    if (arguments.sheet.empty())
+        requireNothingElseGiven(verb, {"--columns"}, " is about --sheet");
     if (!arguments.draws())
         requireNothingElseGiven(verb, {"--width", "--height", "--colors", "--scale", "--scale-factor", "--gain"},
-                                " is about a picture: --png or --svg says where to");
+                                " is about a picture: --png, --svg or --sheet says where to");
     if (!arguments.writes())
         requireNothingElseGiven(verb, {"--start", "--end", "--frames", "--channels", "--force"},
-                                " is about a picture or --format: --png, --svg or --output says where to");
+                                " is about a picture or --format: --png, --svg, --sheet or --output says where to");
     if (!arguments.store)
         requireNothingElseGiven(verb, {"--in-place", "--dry-run", "--backup", "--keep-times", "--timeout"},
                                 " is about --store");
@@ -157,7 +171,7 @@ void requireSense(const OverviewArguments& arguments, const Verb& verb, const Ou
         throw UsageError("--store computes the overview, --stored does not");
     requireSenseOfData(arguments, verb);
     requireOrder(arguments.start, arguments.end);
-    const std::string* const outputs[] = {&arguments.png, &arguments.svg, &arguments.data};
+    const std::string* const outputs[] = {&arguments.png, &arguments.svg, &arguments.data, &arguments.sheet};
     for (std::size_t i = 0; i < std::size(outputs); ++i)
         for (std::size_t j = 0; j < i; ++j)
             if (!outputs[i]->empty() && *outputs[i] == *outputs[j])

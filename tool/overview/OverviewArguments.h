@@ -14,6 +14,8 @@
 struct OverviewArguments {
     FileArguments files;
     std::string png, svg; // where to; empty: none is drawn
+    std::string sheet;    // where the pictures of all files go together
+    std::optional<int> columns;
     PictureSettings picture;
     PictureColors colors = defaultColors();
     std::string data; // where audiowaveform's data goes; empty: nowhere
@@ -27,7 +29,7 @@ struct OverviewArguments {
     unsigned threads = 0;
     EditOptions edit;
 
-    bool draws() const { return !png.empty() || !svg.empty(); }
+    bool draws() const { return !png.empty() || !svg.empty() || !sheet.empty(); }
     bool writes() const { return draws() || !data.empty(); }
     /// Whether standard output is the picture or the data, and nothing else.
     bool takesOutput() const { return png == "-" || svg == "-" || data == "-"; }

@@ -1,4 +1,5 @@
 // ktfiles overview: waveforms as sparklines, numbers and pictures, and stored in the files.
+#include "tool/overview/ContactSheet.h"
 #include "tool/overview/DrawnSamples.h"
 #include "tool/overview/OverviewArguments.h"
 #include "tool/overview/OverviewReport.h"
@@ -14,6 +15,8 @@
 #include <filesystem>
 
 namespace {
+
+constexpr int kSheetWidth = 320, kSheetHeight = 110; // of each picture
 
 // What is asked for of one file, and what it needs.
 struct Task {
@@ -109,6 +112,15 @@ void writeData(const std::string& path, SoundReader& sound, const OverviewArgume
     });
 }
 
+// By the file's own name, or below a folder by where it is in it.
+std::string sheetName(const FoundFile& file)
+{
+    if (!file.isBelowFolder())
+        return std::filesystem::path(file.path).filename().string();
+    const std::size_t start = file.path.find_first_not_of('/', file.folderLength);
+    return start == std::string::npos ? file.path : file.path.substr(start);
+}
+
 // Ahead of the reading, which may take minutes. One that is the file itself is refused later, whatever is asked for.
 void requireFreeNames(const std::string& path, const OverviewArguments& arguments)
 {
@@ -118,10 +130,19 @@ void requireFreeNames(const std::string& path, const OverviewArguments& argument
             requireFreeName(out, arguments.existing);
 }
 
+// The sheet is written when all are read, so that none of them may be it.
+void requireIsNotSheet(const std::string& path, const OverviewArguments& arguments)
+{
+    std::error_code error;
+    if (!arguments.sheet.empty() && std::filesystem::equivalent(arguments.sheet, path, error))
+        throw UsageError("the sheet would be written over " + printable(path));
+}
+
 Reading readFile(const std::string& path, const Task& task)
 {
     const OverviewArguments& arguments = task.arguments;
     requireFreeNames(path, arguments);
+    requireIsNotSheet(path, arguments);
     const FileAccess access = accessForReading(path, arguments.edit.waiting());
     const FileVersion version = versionOf(path);
     if (arguments.store)
@@ -159,6 +180,7 @@ void tellOf(const std::string& path, Reading& reading, const OverviewArguments& 
     OverviewDeeds deeds{.png = arguments.png,
                         .svg = arguments.svg,
                         .data = arguments.data,
+                        .sheet = arguments.sheet,
                         .width = arguments.picture.width * arguments.picture.scaleFactor,
                         .height = arguments.picture.height * arguments.picture.scaleFactor,
                         .store = {},
@@ -167,11 +189,22 @@ void tellOf(const std::string& path, Reading& reading, const OverviewArguments& 
         Output::standard().flush();
         reportFailure(path, reading.overview.note());
     }
-    if (reading.picture)
+    if (reading.picture && arguments.sheet.empty())
         writePictures(path, *reading.picture, arguments);
     if (arguments.store)
         deeds.store = store(path, reading, arguments);
     report.add(path, reading.overview, deeds);
+}
+
+bool writeSheet(const ContactSheet& sheet, const OverviewArguments& arguments, OverviewReport& report)
+{
+    return reportingFailures(arguments.sheet, [&] {
+        const ContactSheet::Size size = sheet.size();
+        writeOutputFile(arguments.sheet, {}, arguments.existing, [&](const Sink& sink) {
+            sheet.write(*sheetFormatOf(arguments.sheet), arguments.colors, sink);
+        });
+        report.addSheet(arguments.sheet, sheet.count(), size.width, size.height);
+    });
 }
 
 bool runOverview(OverviewArguments& arguments, const Verb& verb, OutputOptions output)
@@ -181,15 +214,33 @@ bool runOverview(OverviewArguments& arguments, const Verb& verb, OutputOptions o
     arguments.files.takesFolders = !arguments.store;
     if (arguments.takesOutput()) // nothing else
         output.quiet = true;
+    const bool hasSheet = !arguments.sheet.empty();
+    if (hasSheet && !verb.isGiven("--width"))
+        arguments.picture.width = kSheetWidth;
+    if (hasSheet && !verb.isGiven("--height"))
+        arguments.picture.height = kSheetHeight;
+    if (hasSheet && !reportingFailures(arguments.sheet, [&] { requireFreeName(arguments.sheet, arguments.existing); }))
+        return false;
     OverviewReport report(output, arguments.files);
+    ContactSheet sheet(arguments.picture, arguments.columns);
     const Task task{arguments, arguments.store || output.wantsJson() || !arguments.writes()};
-    const bool good = forEachFile(
+    bool good = forEachFile(
         arguments.files, {.threads = arguments.threads, .quiet = output.quiet},
         [&](const FoundFile& file) -> FileRest {
             const auto reading = std::make_shared<Reading>(readFile(file.path, task));
-            return [&, path = file.path, reading] { tellOf(path, *reading, arguments, report); };
+            return [&, file, reading] {
+                if (hasSheet)
+                    sheet.add({sheetName(file), reading->overview.duration(), std::move(reading->picture), {}});
+                tellOf(file.path, *reading, arguments, report);
+            };
         },
-        [&](const std::string& path, const std::string& text) { report.addFailure(path, text); });
+        [&](const std::string& path, const std::string& text) {
+            if (hasSheet)
+                sheet.add({std::filesystem::path(path).filename().string(), {}, {}, text});
+            report.addFailure(path, text);
+        });
+    if (hasSheet && sheet.count() > 0)
+        good = writeSheet(sheet, arguments, report) && good;
     report.finish();
     return good;
 }

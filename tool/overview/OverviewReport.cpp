@@ -111,12 +111,20 @@ void OverviewReport::addJson(const std::string& path, const FileOverview& overvi
         json.beginArray().write(point.minimum).write(point.maximum).endArray();
     json.endArray();
     json.knownMember("png", deeds.png).knownMember("svg", deeds.svg).knownMember("output", deeds.data);
+    json.knownMember("sheet", deeds.sheet);
     if (deeds.store) {
         json.member("stored", deeds.store->stored).member("changed", deeds.store->changed);
         json.member("dryRun", deeds.dryRun).knownMember("backup", deeds.store->backup);
     }
     json.endObject();
     json_.end();
+}
+
+void OverviewReport::addSheet(const std::string& out, std::size_t files, int width, int height)
+{
+    if (form_ == Form::table || form_ == Form::lines)
+        output_.print("{} {} drawn to {}, {} x {}\n", withThousands(static_cast<std::int64_t>(files)),
+                      files == 1 ? "file" : "files", printable(out), width, height);
 }
 
 void OverviewReport::addFailure(const std::string& path, const std::string& text)

@@ -13,11 +13,12 @@
 /// What was done with a file's overview beside showing it.
 struct OverviewDeeds {
     std::string png, svg, data; // the files that were written; empty or "-": none to tell of
+    std::string sheet;          // told of when it is written
     int width = 0, height = 0;
     std::optional<StoreResult> store;
     bool dryRun = false;
 
-    bool any() const { return !png.empty() || !svg.empty() || !data.empty() || store; }
+    bool any() const { return !png.empty() || !svg.empty() || !data.empty() || !sheet.empty() || store; }
 };
 
 class OverviewReport {
@@ -27,6 +28,7 @@ public:
 
     /// The overview has points unless there are deeds to tell of, and no JSON to write.
     void add(const std::string& path, const FileOverview& overview, const OverviewDeeds& deeds);
+    void addSheet(const std::string& out, std::size_t files, int width, int height);
     void addFailure(const std::string& path, const std::string& text);
     void finish();
 

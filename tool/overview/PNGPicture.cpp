@@ -1,9 +1,7 @@
 #include "tool/overview/PNGPicture.h"
 
 #include "tool/overview/LabelFont.h"
-#include "tool/shared/output/Failure.h"
-
-#include <png.h>
+#include "tool/overview/PNGFile.h"
 
 #include <algorithm>
 #include <cmath>
@@ -172,23 +170,8 @@ std::string pngOf(const WaveformPicture& picture, const PictureColors& colors)
     const PictureFrame& frame = picture.frame;
     Raster raster(frame.width * frame.scaleFactor, frame.height * frame.scaleFactor);
     drawPicture(raster, picture, 0, 0);
-    std::array<png_byte, 4 * 256> palette;
-    std::size_t at = 0;
-    for (const Color& color : Raster::palette(colors))
-        for (const png_byte channel : {color.red, color.green, color.blue, color.alpha})
-            palette[at++] = channel;
-
-    png_image image = {};
-    image.version = PNG_IMAGE_VERSION;
-    image.width = static_cast<png_uint_32>(raster.width());
-    image.height = static_cast<png_uint_32>(raster.height());
-    image.format = PNG_FORMAT_RGBA_COLORMAP;
-    image.colormap_entries = 256;
-    image.flags = PNG_IMAGE_FLAG_FAST;
-    std::string bytes(PNG_IMAGE_PNG_SIZE_MAX(image), '\0');
-    png_alloc_size_t size = bytes.size();
-    if (png_image_write_to_memory(&image, bytes.data(), &size, 0, raster.pixels().data(), 0, palette.data()) == 0)
-        throw Failure(std::string("no PNG can be made of it: ") + image.message);
-    bytes.resize(size);
-    return bytes;
+    PNGFile png(raster.width(), raster.height(), colors);
+    png.add(raster);
+    png.finish();
+    return png.take();
 }

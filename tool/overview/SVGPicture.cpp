@@ -42,13 +42,6 @@ const char* word(Anchor anchor)
     return anchor == Anchor::start ? "start" : anchor == Anchor::end ? "end" : "middle";
 }
 
-std::string text(const std::string& label, float x, float y, Anchor anchor)
-{
-    return label.empty() ? std::string()
-                         : fmt::format("<text x=\"{}\" y=\"{}\" text-anchor=\"{}\">{}</text>\n", number(x), number(y),
-                                       word(anchor), label);
-}
-
 // Lines of the axes as path data, and their labels as elements.
 struct AxisParts {
     std::string lines, faintLines, labels;
@@ -64,7 +57,7 @@ AxisParts timeAxis(const WaveformPicture& picture)
         lines += fmt::format("M{} {}v{}", number(std::floor(tick.at) + 0.5F), frame.plotHeight + 1,
                              tick.label.empty() ? kMinorTickLength : kMajorTickLength);
         parts.labels +=
-            text(tick.label, tick.labelAt, static_cast<float>(frame.plotHeight) + kLabelBaseline, tick.anchor);
+            svgText(tick.label, tick.labelAt, static_cast<float>(frame.plotHeight) + kLabelBaseline, tick.anchor);
     }
     return parts;
 }
@@ -77,9 +70,9 @@ AxisParts scale(const WaveformPicture& picture)
         const float y = std::floor(level.at - 0.5F) + 0.5F;
         parts.lines += fmt::format("M{} {}h{}", frame.left - kLevelTickLength, number(y), kLevelTickLength);
         parts.faintLines += fmt::format("M{} {}H{}", frame.left, number(y), frame.width);
-        parts.labels += text(level.label, static_cast<float>(frame.left) - kLabelGap, level.labelAt, Anchor::end);
+        parts.labels += svgText(level.label, static_cast<float>(frame.left) - kLabelGap, level.labelAt, Anchor::end);
     }
-    parts.labels += text(picture.unit.label, kLabelGap, picture.unit.at, Anchor::start);
+    parts.labels += svgText(picture.unit.label, kLabelGap, picture.unit.at, Anchor::start);
     return parts;
 }
 
@@ -91,15 +84,15 @@ AxisParts laneParts(const WaveformPicture& picture)
         parts.faintLines +=
             fmt::format("M{} {}H{}", picture.frame.left, number(std::floor(border) + 0.5F), picture.frame.width);
     for (const PictureTick& name : picture.names)
-        parts.labels += text(name.label, static_cast<float>(picture.frame.labelsEnd), name.labelAt, Anchor::end);
+        parts.labels += svgText(name.label, static_cast<float>(picture.frame.labelsEnd), name.labelAt, Anchor::end);
     return parts;
 }
 
 std::string axisText(const AxisParts& parts, Color color, float faintTone)
 {
-    return fmt::format("<g stroke=\"{0}\"><path d=\"{1}\" stroke-opacity=\"{2:.2g}\"/><path d=\"{3}\"/></g>\n"
-                       "<g fill=\"{0}\" font-family=\"sans-serif\" font-size=\"{4:.3g}\">\n{5}</g>\n",
-                       hex(color), parts.faintLines, faintTone, parts.lines, kSVGFontSize, parts.labels);
+    return fmt::format("<g stroke=\"{0}\"><path d=\"{1}\" stroke-opacity=\"{2:.2g}\"/><path d=\"{3}\"/></g>\n",
+                       hex(color), parts.faintLines, faintTone, parts.lines) +
+           svgLabels(parts.labels, color);
 }
 
 // Cut to its lane: the view box of an element of its own.
@@ -150,6 +143,19 @@ std::string markText(const WaveformPicture& picture, const PictureColors& colors
 }
 
 } // namespace
+
+std::string svgText(const std::string& label, float x, float y, Anchor anchor)
+{
+    return label.empty() ? std::string()
+                         : fmt::format("<text x=\"{}\" y=\"{}\" text-anchor=\"{}\">{}</text>\n", number(x), number(y),
+                                       word(anchor), label);
+}
+
+std::string svgLabels(const std::string& texts, Color color)
+{
+    return fmt::format("<g fill=\"{}\" font-family=\"sans-serif\" font-size=\"{:.3g}\">\n{}</g>\n", hex(color),
+                       kSVGFontSize, texts);
+}
 
 std::string svgEscaped(const std::string& text)
 {

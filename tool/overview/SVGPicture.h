@@ -20,3 +20,6 @@ std::string svgHead(int width, int height, int scaleFactor, const PictureColors&
 std::string svgParts(const WaveformPicture& picture, const PictureColors& colors);
 /// A text for people, fit to stand between tags.
 std::string svgEscaped(const std::string& text);
+/// A label that is escaped, and labels in their font and color.
+std::string svgText(const std::string& label, float x, float y, Anchor anchor);
+std::string svgLabels(const std::string& texts, Color color);

@@ -60,6 +60,9 @@ class Check(CommandTest):
         self.assertEqual([finding["kind"] for finding in records[1]["findings"]], ["containerIsCut", "chunkIsCut"])
         self.assertEqual(records[1]["findings"][1]["offset"], 36)
         self.assertEqual(records[1]["findings"][1]["id"], "data")
+        self.write("a.aifc", (MEDIA / "tone-fl32.aifc").read_bytes().replace(b"FVER", b"ever"))
+        self.assertEqual(self.lines("info", "--check", "a.aifc", status=1),
+                         ['a.aifc: 0: "FVER" is missing; strict readers refuse the file'])
         # What cannot be read at all is an error as ever.
         self.write("none.wav", b"")
         self.assertEqual(self.failure("info", "--check", "none.wav"), "ktfiles: none.wav: is empty\n")

@@ -67,6 +67,24 @@ class Metadata(CommandTest):
         piped = subprocess.run([KTFILES, "decode", "-q", "a.wav", "-o", "-"], cwd=self.folder, capture_output=True, check=True)
         self.assertEqual(piped.stdout, content)
 
+    def test_sizes_are_right_beyond_4_gib(self):
+        """Also where only the chunks beside the sound make it RF64."""
+        kept = bext(7) + info(INAM="Long")
+        for size in (5 << 30, 0xFFFFFFFF - 8 - len(kept)):
+            size -= size % 2
+            with open(self.folder / "a.wav", "wb") as file:
+                file.write(b"RF64\xff\xff\xff\xffWAVE" + chunk(b"ds64", struct.pack("<QQQI", 72 + len(kept) + size, size, size // 2, 0)))
+                file.write(kept + wave()[12:36] + b"data\xff\xff\xff\xff")
+                file.truncate(file.tell() + size)
+            with subprocess.Popen([KTFILES, "decode", "-q", "a.wav", "-o", "-"], cwd=self.folder, stdout=subprocess.PIPE) as process:
+                head = process.stdout.read(80 + len(kept))
+                process.stdout.close()
+            self.assertEqual((head[:4], head[12:16]), (b"RF64", b"ds64"))
+            self.assertEqual(struct.unpack_from("<QQQ", head, 20), (72 + len(kept) + size, size, size // 2))
+            self.assertEqual(head[72:-8], kept)
+        # In AIFF there is no room for more.
+        self.assertIn("has too much sound for an AIFF file", self.failure("decode", "a.wav", "-o", "x.aiff"))
+
     def test_odd_and_big_endian_sources(self):
         self.write("a.wav", wave(bext(5, HISTORY + b"odd"), chunk(b"iXML", b"<a>" + b"\0"), frames=9600))
         self.decode()

@@ -83,6 +83,11 @@ FindingWords wordsOf(const platform::ContainerFinding& finding)
                 "some players show another length"};
     case Kind::factIsMissing:
         return {"factIsMissing", "is missing", "readers estimate the length, or decode to learn it"};
+    case Kind::versionIsMissing:
+        return {"versionIsMissing", "is missing", "strict readers refuse the file"};
+    case Kind::offsetIsWrong:
+        return {"offsetIsWrong", fmt::format("begins its samples at {}, of {}", stated, bytesText(found)),
+                "readers find no sound, or take it from the start"};
     case Kind::tableIsShort:
         return {"tableIsShort", fmt::format("counts {} further sizes, and has room for {}", stated, found),
                 "readers pass over them, or refuse the file"};

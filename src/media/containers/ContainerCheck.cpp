@@ -1,6 +1,7 @@
 #include "media/containers/ContainerCheck.h"
 
 #include "media/containers/AudioDescription.h"
+#include "media/containers/ChunkBodyCheck.h"
 #include "media/containers/ChunkRules.h"
 #include "media/containers/ChunkWalk.h"
 
@@ -17,14 +18,6 @@ using Kind = ContainerFinding::Kind;
 
 constexpr std::uint32_t kOpenField = 0xFFFFFFFF;
 
-/// Whether four bytes may be a chunk's name.
-bool isName(const std::byte* bytes)
-{
-    return bytes != nullptr && std::all_of(bytes, bytes + 4, [](std::byte byte) {
-               return byte >= std::byte{' '} && byte <= std::byte{'~'};
-           });
-}
-
 /// One look through one file.
 class Check {
 public:
@@ -40,9 +33,6 @@ private:
     void checkContainerSize();
     void checkPlace(const WalkedChunk& chunk);
     void checkSize(const WalkedChunk& chunk);
-    void checkBody(const WalkedChunk& chunk);
-    void checkTable(const WalkedChunk& chunk);
-    void checkList(const WalkedChunk& chunk);
     bool checkPad(const WalkedChunk& chunk);
     void checkEnd();
     std::uint64_t chunksBehind(std::uint64_t position);
@@ -79,7 +69,7 @@ std::int32_t Check::run()
         checkPlace(chunk);
         checkSize(chunk);
         if (chunk.hasItsBytes(window_.length()))
-            checkBody(chunk);
+            checkChunkBody(window_, container(), chunk, [this](const ContainerFinding& finding) { add(finding); });
         isLost = !checkPad(chunk);
     }
     if (!isLost)
@@ -164,8 +154,10 @@ void Check::checkSize(const WalkedChunk& chunk)
              .stated = chunk.field,
              .found = sizes64});
     if (isSound(chunk) && chunk.size == INT64_MAX) {
-        // The rules of CAF and AU let the last chunk go to the end of the file.
-        if (kind != ContainerKind::caf && kind != ContainerKind::au)
+        // The rules of CAF and AU let the last chunk go to the end of the file; CAF by a size of -1 and no other.
+        const std::byte* const field = kind == ContainerKind::caf ? window_.at(chunk.position + 4, 8) : nullptr;
+        const bool isByRule = kind == ContainerKind::au || (field != nullptr && loadBE<std::int64_t>(field) == -1);
+        if (!isByRule)
             add({.kind = Kind::sizeIsOpen, .chunk = chunk.id, .offset = chunk.position, .found = there});
         return;
     }
@@ -180,62 +172,6 @@ void Check::checkSize(const WalkedChunk& chunk)
              .found = chunk.body + size});
 }
 
-/// What the chunk itself holds.
-void Check::checkBody(const WalkedChunk& chunk)
-{
-    const std::byte* const name = traits().hasChunks ? window_.at(chunk.position, sizeof(FourCC)) : nullptr;
-    if (name != nullptr && !isName(name))
-        add({.kind = Kind::idIsNoName, .chunk = chunk.id, .offset = chunk.position});
-    const auto size = static_cast<std::uint64_t>(chunk.size);
-    if (const std::uint32_t least = leastSizeOfChunk(traits().kind, chunk.id); size < least)
-        add({.kind = Kind::chunkIsShort, .chunk = chunk.id, .offset = chunk.position, .stated = least, .found = size});
-    if (chunk.id == kDs64 && chunk.position == traits().firstChunk)
-        checkTable(chunk);
-    if (chunk.id == fourCC("LIST") && traits().chunkHeaderSize == sizeof(ChkHeader))
-        checkList(chunk);
-}
-
-/// The sizes of further chunks, behind those that every "ds64" has.
-void Check::checkTable(const WalkedChunk& chunk)
-{
-    constexpr std::uint64_t fixedSize = 28, entrySize = 12;
-    const std::byte* const count = chunk.size >= std::int64_t{fixedSize} ? window_.at(chunk.body + 24, 4) : nullptr;
-    if (count == nullptr)
-        return;
-    const std::uint64_t room = (static_cast<std::uint64_t>(chunk.size) - fixedSize) / entrySize;
-    if (const auto entries = loadLE<std::uint32_t>(count); entries > room)
-        add({.kind = Kind::tableIsShort,
-             .chunk = chunk.id,
-             .offset = chunk.position,
-             .stated = entries,
-             .found = room});
-}
-
-/// The chunks in a chunk: the first that does not fit ends it, as it does for readers.
-void Check::checkList(const WalkedChunk& chunk)
-{
-    const std::uint64_t end = chunk.body + static_cast<std::uint64_t>(chunk.size);
-    for (std::uint64_t at = chunk.body + sizeof(FourCC); at + sizeof(ChkHeader) <= end;) {
-        const std::byte* const header = window_.at(at, sizeof(ChkHeader));
-        if (header == nullptr || loadBE<FourCC>(header) == 0) // room behind the last
-            return;
-        const auto id = loadBE<FourCC>(header);
-        const std::uint64_t size = load<std::uint32_t>(header + sizeof(FourCC), traits().order);
-        const std::uint64_t bodyEnd = at + sizeof(ChkHeader) + size;
-        if (bodyEnd > end) {
-            add({.kind = Kind::chunkReachesOut, .chunk = id, .offset = at, .stated = end, .found = bodyEnd});
-            return;
-        }
-        const std::byte* const next =
-            (size & 1) != 0 && bodyEnd + sizeof(ChkHeader) <= end ? window_.at(bodyEnd, sizeof(ChkHeader)) : nullptr;
-        const bool isPadless = isName(next) && load<std::uint32_t>(next + sizeof(FourCC), traits().order) <=
-                                                   end - bodyEnd - sizeof(ChkHeader);
-        if (isPadless)
-            add({.kind = Kind::padIsMissing, .chunk = id, .offset = at, .found = size});
-        at = bodyEnd + (isPadless ? 0 : size & 1);
-    }
-}
-
 /// False where nobody can tell how the chunks go on: a byte that is not zero is taken for the start of the next one by
 /// readers that know of missing pad bytes, and for a pad byte by all others.
 bool Check::checkPad(const WalkedChunk& chunk)
@@ -248,7 +184,7 @@ bool Check::checkPad(const WalkedChunk& chunk)
     if (found != nullptr && *found == std::byte{0})
         return true;
     const auto byte = found != nullptr ? static_cast<std::uint64_t>(*found) : 0;
-    const bool isPad = found != nullptr && !isName(window_.at(end, 4)) && isName(window_.at(end + 1, 4));
+    const bool isPad = found != nullptr && !isChunkName(window_.at(end, 4)) && isChunkName(window_.at(end + 1, 4));
     if (isPad)
         add({.kind = Kind::padIsNotZero, .chunk = chunk.id, .offset = end, .found = byte});
     else
@@ -291,7 +227,7 @@ std::uint64_t Check::chunksBehind(std::uint64_t position)
     const std::uint64_t length = window_.length();
     while (traits().chunkHeaderSize == sizeof(ChkHeader) && length - position >= sizeof(ChkHeader)) {
         const std::byte* const header = window_.at(position, sizeof(ChkHeader));
-        if (!isName(header))
+        if (!isChunkName(header))
             break;
         const std::uint64_t size = load<std::uint32_t>(header + sizeof(FourCC), traits().order);
         if (size > length - position - sizeof(ChkHeader))
@@ -311,6 +247,8 @@ void Check::checkSound(const AudioDescription& sound)
         add({.kind = Kind::formatIsMissing, .chunk = formatId, .offset = formatAt_});
         return;
     }
+    if (container().formType == fourCC("AIFC") && !places_.contains(fourCC("FVER")))
+        add({.kind = Kind::versionIsMissing, .chunk = fourCC("FVER")});
     const StreamDescription& stream = sound.stream();
     const bool isPCM = stream.isLinearPCM();
     if (stream.channelsPerFrame == 0 || !(stream.sampleRate > 0) || (isPCM && stream.bytesPerFrame == 0)) {

@@ -36,6 +36,8 @@ struct ContainerFinding {
         framesDiffer,      // the chunk counts `stated` frames, there are `found`
         sizes64AreMissing, // a 64-bit WAVE file without a "ds64"
         sizes64Differ,     // stated: the own size of the chunk, or of the container; found: what the "ds64" says of it
+        versionIsMissing,  // AIFC's "FVER"
+        offsetIsWrong,     // stated: where AIFF's samples begin in their chunk; found: how many bytes that has
         tableIsShort,      // stated: entries that a "ds64" counts; found: those that it has room for
         digestIsWrong,     // found: its size in bytes, which is that of no MD5
         digestDiffers      // the MD5 that the chunk states is not that of the samples

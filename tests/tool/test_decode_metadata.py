@@ -1,4 +1,5 @@
 """ktfiles decode: what an output keeps of what stands beside the sound, read back by other programs."""
+import hashlib
 import json
 import re
 import struct
@@ -126,6 +127,8 @@ class Metadata(CommandTest):
         self.assertEqual(self.get("out.wav", "bext")[602:], b"A=PCM\r\nA=PCM,F=48000,W=32,M=mono,T=ktfiles decode\r\n")
 
     def test_what_cannot_be_made_true_is_told(self):
+        self.write("a.wav", wave(chunk(b"MD5 ", hashlib.md5(wave(frames=9600)[44:]).digest()[::-1]), frames=9600))
+        self.assertEqual((self.decode()["kept"], self.decode("--bits", "24")["notKept"]), (["MD5"], ["MD5 is not carried over"]))
         self.write("a.wav", wave(chunk(b"iXML", b"<TRACK/><SYNC_POINT_LOW>5</SYNC_POINT_LOW><TRACK>"), frames=9600))
         told = self.decode("--start", "1", "--channels", "2")
         self.assertEqual(told["notKept"], ["iXML still has times of the whole file at its own rate", "iXML still has the tracks of the file"])

@@ -17,10 +17,10 @@ using platform::ContainerKind;
 namespace {
 
 constexpr FourCC kBext = fourCC("bext"), kIXML = fourCC("iXML"), kAxml = fourCC("axml"), kChna = fourCC("chna"),
-                 kCue = fourCC("cue "), kList = fourCC("LIST"), kMark = fourCC("MARK"), kRemark = fourCC("ANNO"),
-                 kComments = fourCC("COMT"), kCAFInfo = fourCC("info"), kCAFMarkers = fourCC("mark"),
-                 kCAFTexts = fourCC("strg");
-constexpr std::array kOfWAVE{kBext, kIXML, kAxml, kChna, kCue, kList};
+                 kCue = fourCC("cue "), kDigest = fourCC("MD5 "), kList = fourCC("LIST"), kMark = fourCC("MARK"),
+                 kRemark = fourCC("ANNO"), kComments = fourCC("COMT"), kCAFInfo = fourCC("info"),
+                 kCAFMarkers = fourCC("mark"), kCAFTexts = fourCC("strg");
+constexpr std::array kOfWAVE{kBext, kIXML, kAxml, kChna, kCue, kList, kDigest};
 constexpr std::array kOfAIFF{kMark, kComments, fourCC("NAME"), fourCC("AUTH"), fourCC("(c) "), kRemark};
 constexpr std::array kOfCAF{kCAFInfo, kCAFMarkers, kCAFTexts};
 constexpr std::array<std::string_view, 7> kOfTexts{"INFO", "info", "NAME", "AUTH", "(c)", "ANNO", "COMT"};
@@ -167,6 +167,8 @@ private:
                 keep(kCAFMarkers, {kCAFMarkers, movedCAFMarkers(body, change(), dropped_)});
             else if (chunk.id == kCAFInfo)
                 copyCAFInfo(chunk);
+            else if (chunk.id == kDigest)
+                copyDigest(chunk);
             else if (chunk.id == kCAFTexts || chunk.id == kRemark || chunk.id == kComments || !tagsFollow_)
                 keep(chunk.id, chunk);
         }
@@ -183,6 +185,13 @@ private:
         const bool saysRates = chunk.id == kAxml && textOf(chunk.body).find("sampleRate=") != std::string_view::npos;
         if (saysRates && changed_.isRecoded)
             kept_.notKept.emplace_back("axml still has the sample rates and bit depths of the file");
+    }
+
+    /// Of the same bytes it is true.
+    void copyDigest(const HeldChunk& chunk)
+    {
+        if (change().isWhole && !changed_.isRecoded && source_.order_ == std::endian::little)
+            keep(kDigest, chunk);
     }
 
     bool copyList(const HeldChunk& chunk)

@@ -35,16 +35,17 @@ _ktfiles()
         --color) COMPREPLY=($(compgen -W 'auto always never' -- "$cur")); return ;;
         --coordination | --with) _filedir -d; return ;;
         --files-from | --from | -o | --output | --png | --svg | --sheet) _filedir; return ;;
+        --only) COMPREPLY=($(compgen -W 'bext ixml info cue smpl inst acid cart chna axml comt mark strg regn id3 xmp' -- "$cur")); return ;;
         --sidecar) return ;;
         --colors) COMPREPLY=($(compgen -W 'night day amber rose ink' -- "$cur")); return ;;
         --width | --height | --start | --end | --alternative | --keep | --timeout) return ;;
     esac
 
     if ((cword == 1)); then
-        COMPREPLY=($(compgen -W 'info pair chunks tags scan overview adm project lock locks decode help --help --version -V' -- "$cur"))
+        COMPREPLY=($(compgen -W 'info pair chunks tags meta scan overview adm project lock locks decode help --help --version -V' -- "$cur"))
     elif [[ $verb == help ]]; then
         if ((cword == 2)); then
-            COMPREPLY=($(compgen -W 'info pair chunks tags scan overview adm project lock locks decode' -- "$cur"))
+            COMPREPLY=($(compgen -W 'info pair chunks tags meta scan overview adm project lock locks decode' -- "$cur"))
         elif ((cword == 3)) && [[ $object == chunks ]]; then
             COMPREPLY=($(compgen -W 'get add remove' -- "$cur"))
         elif ((cword == 3)) && [[ $object == tags ]]; then
@@ -66,6 +67,7 @@ _ktfiles()
                 --force --threads $files $common" -- "$cur")) ;;
             lock/*) COMPREPLY=($(compgen -W "--read --write --presenter --timeout -- $common" -- "$cur")) ;;
             scan/*) COMPREPLY=($(compgen -W "--csv --threads $files $common" -- "$cur")) ;;
+            meta/*) COMPREPLY=($(compgen -W "--only --csv --threads $files $common" -- "$cur")) ;;
             tags/*) COMPREPLY=($(compgen -W "--threads $files $common" -- "$cur")) ;;
             chunks/* | pair/*) COMPREPLY=($(compgen -W "$files $common" -- "$cur")) ;;
             project/media) COMPREPLY=($(compgen -W "--missing --alternative $common" -- "$cur")) ;;

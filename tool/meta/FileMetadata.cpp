@@ -1,0 +1,125 @@
+#include "tool/meta/FileMetadata.h"
+
+#include "tool/meta/MetaReaders.h"
+#include "tool/shared/input/InputFile.h"
+#include "tool/shared/output/Failure.h"
+
+#include <algorithm>
+#include <array>
+#include <set>
+
+namespace {
+
+constexpr std::int64_t kMostBytes = 16 << 20; // of all chunks that are held whole
+constexpr std::int64_t kHead = 64;            // of the others
+
+// What `info` and `chunks` tell of: coding, samples, room that is not used.
+constexpr std::array kStructure{fourCC("fmt "), fourCC("data"), fourCC("ds64"), fourCC("COMM"), fourCC("SSND"),
+                                fourCC("FVER"), fourCC("desc"), fourCC("pakt"), fourCC("kuki"), fourCC("JUNK"),
+                                fourCC("junk"), fourCC("PAD "), fourCC("FLLR"), fourCC("free")};
+
+std::span<const MetaReader> readersOf(const ContainerExtent& extent)
+{
+    switch (extent.kind) {
+    case platform::ContainerKind::iff:
+        return aiffReaders();
+    case platform::ContainerKind::caf:
+        return cafReaders();
+    default:
+        return waveReaders();
+    }
+}
+
+std::string lowered(std::string_view text)
+{
+    std::string small;
+    for (const char c : text)
+        small += c >= 'A' && c <= 'Z' ? static_cast<char>(c - 'A' + 'a') : c;
+    return small;
+}
+
+/// Spaces belong to an id, not to the name of its fields.
+std::string groupOf(FourCC id)
+{
+    const std::string text = fourCCText(id);
+    return text.substr(0, std::max<std::size_t>(text.find_last_not_of(' ') + 1, 1));
+}
+
+const MetaReader* readerOf(FourCC id, std::span<const MetaReader> readers)
+{
+    const auto reader = std::ranges::find(readers, id, &MetaReader::id);
+    return reader == readers.end() ? nullptr : &*reader;
+}
+
+/// The chunks that may be metadata, in the order of the file; with `extent` of the container.
+MetaSource collect(CAudioFileIO& file, ContainerExtent& extent)
+{
+    MetaSource source;
+    std::int32_t readStatus = kStatusOK;
+    std::int64_t room = kMostBytes;
+    const std::int32_t status = file.ForEachChunk(
+        [&](const ChunkEntry& entry) {
+            if (std::ranges::find(kStructure, entry.id) != kStructure.end())
+                return true;
+            MetaChunk& chunk = source.chunks.emplace_back();
+            chunk.id = entry.id;
+            chunk.offset = entry.offset;
+            chunk.size = std::max<std::int64_t>(entry.size, 0);
+            const std::int64_t there = std::clamp<std::int64_t>(extent.fileLength - entry.body, 0, chunk.size);
+            const MetaReader* const reader = readerOf(entry.id, readersOf(extent));
+            chunk.isHeld = reader != nullptr && reader->read != readPreview && there <= room;
+            chunk.body.resize(static_cast<std::size_t>(chunk.isHeld ? there : std::min(there, kHead)));
+            room -= std::ssize(chunk.body);
+            if (!chunk.body.empty())
+                readStatus = file.Read(chunk.body.data(), entry.body, std::ssize(chunk.body), nullptr);
+            return readStatus == kStatusOK;
+        },
+        &extent);
+    requireOK(readStatus);
+    if (status != kStatusOK)
+        throw Failure(source.chunks.empty() ? "its container header cannot be read" : "a chunk header cannot be read");
+    source.order = extent.kind == platform::ContainerKind::riff || extent.kind == platform::ContainerKind::wave64
+                       ? std::endian::little
+                       : std::endian::big;
+    return source;
+}
+
+void readChunk(const MetaChunk& chunk, std::span<const MetaReader> readers, const MetaSource& source,
+               MetaFields& fields)
+{
+    const MetaReader* const reader = readerOf(chunk.id, readers);
+    if (chunk.id == fourCC("LIST")) // its reader says which
+        fields.enterShared(chunk, "LIST");
+    else
+        fields.enter(chunk, reader != nullptr ? reader->group : groupOf(chunk.id));
+    if (reader == nullptr || !chunk.isHeld || !reader->read(chunk, source, fields))
+        fields.preview("", chunk.body, static_cast<std::uint64_t>(chunk.size));
+}
+
+} // namespace
+
+FileMetadata readMetadata(const std::string& path, const MetaGroups& groups)
+{
+    CAudioFileIO file;
+    openChunks(file, path);
+    ContainerExtent extent;
+    const MetaSource source = collect(file, extent);
+    MetaFields fields(file.Info().exactSampleRate);
+    for (const MetaChunk& chunk : source.chunks)
+        readChunk(chunk, readersOf(extent), source, fields);
+    FileMetadata metadata{extent.id, fields.take()};
+    if (!groups.empty())
+        std::erase_if(metadata.fields, [&](const MetaField& field) {
+            return std::ranges::find(groups, lowered(field.group)) == groups.end();
+        });
+    return metadata;
+}
+
+std::vector<std::string> metaGroups()
+{
+    std::set<std::string> groups{"info"}; // with "adtl", which goes to "cue", a LIST
+    for (const auto& readers : {waveReaders(), aiffReaders(), cafReaders()})
+        for (const MetaReader& reader : readers)
+            groups.insert(lowered(reader.group));
+    return {groups.begin(), groups.end()};
+}

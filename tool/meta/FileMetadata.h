@@ -1,0 +1,20 @@
+// The metadata of one file, read by field.
+#pragma once
+
+#include "tool/meta/MetaFields.h"
+
+struct FileMetadata {
+    FourCC container = 0; // the outermost id: "RIFF", "FORM", "caff" …
+    std::vector<MetaField> fields;
+};
+
+/// Which groups of fields are wanted, in small letters; empty: all.
+using MetaGroups = std::vector<std::string>;
+
+/// Of WAVE, RF64, BW64, RIFX, Wave64, AIFF, AIFC and CAF files; throws Failure, for another OtherKind. Chunks that say
+/// how samples are coded, and room that is not used, are left out; of those that nobody here knows the first bytes are
+/// shown.
+FileMetadata readMetadata(const std::string& path, const MetaGroups& groups);
+
+/// The groups by which fields go, of all containers, each once.
+std::vector<std::string> metaGroups();

@@ -1,0 +1,226 @@
+// ktfiles meta: what files say about themselves, by field.
+#include "tool/meta/FileMetadata.h"
+#include "tool/shared/access/FileAccess.h"
+#include "tool/shared/arguments/CommandLine.h"
+#include "tool/shared/arguments/ThreadsOption.h"
+#include "tool/shared/input/FileByFile.h"
+#include "tool/shared/output/ClockTime.h"
+#include "tool/shared/output/JsonRecords.h"
+
+#include <algorithm>
+
+namespace {
+
+struct MetaOptions {
+    MetaGroups only;
+    bool isCSV = false;
+    unsigned threads = 0;
+};
+
+constexpr std::size_t kIdLength = 4;
+constexpr const char* kLatin1 = "ISO-8859-1";
+
+std::string valueText(const MetaField& field)
+{
+    return std::visit([](const auto& value) { return fmt::format("{}", value); }, field.value);
+}
+
+std::string timeText(double seconds)
+{
+    return clockText(seconds, 3, ShowHours::always);
+}
+
+/// A value as people read it: "480000 (0:00:10.000)", "-23 LUFS", "12 bytes: 0a00 |..|".
+std::string readable(const MetaField& field)
+{
+    const std::string value = printable(valueText(field));
+    if (field.byteSize)
+        return fmt::format("{}{}{} bytes: {}{} |{}|", printable(field.words), field.words.empty() ? "" : ", ",
+                           *field.byteSize, value, value.size() < *field.byteSize * 2 ? "…" : "", field.ascii);
+    if (field.seconds)
+        return fmt::format("{} ({})", value, timeText(*field.seconds));
+    const bool isNumber = !std::holds_alternative<std::string>(field.value);
+    return isNumber && !field.words.empty() ? fmt::format("{} {}", value, printable(field.words)) : value;
+}
+
+void writeField(JsonWriter& json, const MetaField& field)
+{
+    json.newLine().beginObject().member("field", field.fullName());
+    std::visit([&](const auto& value) { json.member("value", value); }, field.value);
+    json.knownMember("words", field.words).knownMember("seconds", field.seconds);
+    json.knownMember("size", field.byteSize).knownMember("ascii", field.ascii);
+    if (field.isLatin1)
+        json.member("encoding", kLatin1);
+    json.member("chunk", fourCCText(field.chunk)).member("offset", field.offset).endObject();
+}
+
+/// RFC 4180.
+std::string quoted(const std::string& text)
+{
+    if (text.find_first_of(",\"\r\n") == std::string::npos)
+        return text;
+    std::string field = "\"";
+    for (const char c : text)
+        field += c == '"' ? "\"\"" : std::string(1, c);
+    return field + '"';
+}
+
+// Writes the fields of one file after the other, each as soon as they are read.
+class MetaWriter {
+public:
+    /// With `several` files each line says which.
+    MetaWriter(const OutputOptions& options, bool isCSV, bool several)
+        : form_(isCSV ? Form::none : outputForm(options)),
+          isCSV_(isCSV && !options.quiet),
+          color_(usesColor(options.color)),
+          several_(several),
+          json_(options)
+    {
+        if (isCSV_)
+            output_.write("path,field,value,seconds,words,size,encoding,chunk,offset\r\n");
+    }
+
+    void add(const std::string& path, const FileMetadata& metadata)
+    {
+        if (isCSV_)
+            addRows(path, metadata);
+        else if (form_ == Form::json)
+            addRecord(path, metadata);
+        else if (form_ == Form::table)
+            addTree(path, metadata);
+        else if (form_ == Form::lines)
+            for (const MetaField& field : metadata.fields)
+                output_.print("{}{}{}\t{}{}{}\n", several_ ? printable(path) : "", several_ ? "\t" : "",
+                              printable(field.fullName()),
+                              field.byteSize ? readable(field) : printable(valueText(field)), field.seconds ? "\t" : "",
+                              field.seconds ? timeText(*field.seconds) : "");
+    }
+
+    void addFailure(const std::string& path, const std::string& text) { json_.addFailure(path, text); }
+
+    void finish() { json_.finish(); }
+
+private:
+    void addRecord(const std::string& path, const FileMetadata& metadata)
+    {
+        JsonWriter& json = json_.begin();
+        json.beginObject().member("path", path).member("container", fourCCText(metadata.container));
+        json.key("fields").beginArray();
+        for (const MetaField& field : metadata.fields)
+            writeField(json, field);
+        json.endArrayOfLines().endObject();
+        json_.end();
+    }
+
+    void addRows(const std::string& path, const FileMetadata& metadata)
+    {
+        for (const MetaField& field : metadata.fields)
+            output_.print("{},{},{},{},{},{},{},{},{}\r\n", quoted(path), quoted(field.fullName()),
+                          quoted(valueText(field)), field.seconds ? fmt::format("{}", *field.seconds) : "",
+                          quoted(field.words), field.byteSize ? fmt::format("{}", *field.byteSize) : "",
+                          field.isLatin1 ? kLatin1 : "", quoted(fourCCText(field.chunk)), field.offset);
+    }
+
+    /// A heading for each chunk, its fields below it, their values in one column.
+    void addTree(const std::string& path, const FileMetadata& metadata)
+    {
+        constexpr std::size_t widest = 40;
+        output_.print("{}{}{}{}  {}\n", isFirst_ ? "" : "\n", bold(), printable(path), plain(),
+                      fourCCText(metadata.container));
+        isFirst_ = false;
+        const MetaField* above = nullptr;
+        for (const MetaField& field : metadata.fields) {
+            const bool isNewPlace = above == nullptr || above->place != field.place || above->offset != field.offset;
+            if (isNewPlace) {
+                width_ = 0;
+                for (const MetaField& other : metadata.fields)
+                    if (other.place == field.place && other.offset == field.offset)
+                        width_ = std::max(width_, std::min(label(other).size(), widest));
+                output_.print("  {}{}{}  \"{}\" at {}\n", bold(), printable(field.place), plain(),
+                              fourCCText(field.chunk), field.offset);
+            }
+            output_.print("    {:<{}}{}{}{}\n", label(field), width_, width_ == 0 ? "" : "  ", readable(field),
+                          field.isLatin1 ? " [Latin-1]" : "");
+            above = &field;
+        }
+        if (metadata.fields.empty())
+            output_.write("  no metadata\n");
+    }
+
+    /// What stands ahead of a value; of a text its id's meaning too.
+    static std::string label(const MetaField& field)
+    {
+        const bool isNamedText =
+            std::holds_alternative<std::string>(field.value) && !field.byteSize && !field.words.empty();
+        return printable(field.name) + (isNamedText ? " " + printable(field.words) : "");
+    }
+
+    const char* bold() const { return color_ ? "\x1b[1m" : ""; }
+    const char* plain() const { return color_ ? "\x1b[0m" : ""; }
+
+    Form form_;
+    bool isCSV_;
+    bool color_;
+    bool several_;
+    bool isFirst_ = true;
+    std::size_t width_ = 0;
+    Output& output_ = Output::standard();
+    JsonRecords json_;
+};
+
+std::string lowered(std::string text)
+{
+    for (char& c : text)
+        c = c >= 'A' && c <= 'Z' ? static_cast<char>(c - 'A' + 'a') : c;
+    return text;
+}
+
+/// "bext,ixml" as groups; what is no group may be the id of a chunk.
+MetaGroups groupsFromText(const std::string& text)
+{
+    const std::vector<std::string> known = metaGroups();
+    MetaGroups groups;
+    for (std::size_t begin = 0; begin <= text.size();) {
+        const std::size_t end = std::min(text.find(',', begin), text.size());
+        const std::string group = lowered(text.substr(begin, end - begin));
+        if (group.empty() || (group.size() > kIdLength && std::ranges::find(known, group) == known.end()))
+            throw UsageError("\"" + printable(group) + "\" names no fields: bext, ixml, info, cue … or a chunk's id");
+        groups.push_back(group);
+        begin = end + 1;
+    }
+    return groups;
+}
+
+bool runMeta(const FileArguments& files, const MetaOptions& wanted, const OutputOptions& options)
+{
+    if (wanted.isCSV && options.wantsJson())
+        throw UsageError("--csv and JSON exclude each other");
+    MetaWriter writer(options, wanted.isCSV, files.maybeSeveral());
+    const FileLoop loop{.threads = wanted.threads, .quiet = options.quiet};
+    return writeFileByFile(writer, files, loop, [&](const FoundFile& file) {
+        const FileAccess access = accessForReading(file.path, {.quiet = options.quiet});
+        return readMetadata(file.path, wanted.only);
+    });
+}
+
+void declareMeta(CommandLine& commandLine)
+{
+    static FileArguments files;
+    static MetaOptions wanted;
+    static std::string only;
+    Verb& verb = commandLine.addVerb("meta", "Show what WAVE, RF64, AIFF and CAF files say about themselves, by field",
+                                     [&commandLine] {
+                                         if (!only.empty())
+                                             wanted.only = groupsFromText(only);
+                                         return runMeta(files, wanted, commandLine.output());
+                                     });
+    CommandLine::addFiles(verb, files);
+    addThreads(verb, wanted.threads);
+    verb.addFlag("--csv", wanted.isCSV, "Print comma-separated values (RFC 4180), with a header");
+    verb.addText("--only", only, "Only these, behind commas: bext, ixml, info, cue, smpl, … or ids of chunks")
+        .label("GROUPS");
+}
+
+const VerbRegistration registration{35, declareMeta};
+
+} // namespace

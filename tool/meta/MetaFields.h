@@ -1,0 +1,93 @@
+// What a file says about itself, as a list of fields with stable names, each told where it stands.
+#pragma once
+
+#include "platform/core/Bytes.h"
+#include "platform/core/FourCC.h"
+
+#include <concepts>
+#include <cstdint>
+#include <map>
+#include <optional>
+#include <string>
+#include <string_view>
+#include <variant>
+#include <vector>
+
+/// One chunk, as far as it is held.
+struct MetaChunk {
+    FourCC id = 0;
+    std::int64_t offset = 0; // of the header, in the file
+    std::int64_t size = 0;   // as stated
+    Bytes body;              // what is there; of what is too long to be held the beginning
+    bool isHeld = true;      // false where `body` is such a beginning
+};
+
+struct MetaField {
+    using Value = std::variant<std::string, std::int64_t, std::uint64_t, double>;
+
+    std::string group;             // "bext": what the option --only asks for
+    std::string place;             // "bext", of a second chunk "bext[1]"
+    std::string name;              // within the place: "description"; empty where the chunk is the field
+    Value value;                   // texts in UTF-8
+    std::string words;             // what the value or its id stands for: "Artist", "LUFS"
+    std::optional<double> seconds; // what a number of frames takes
+    bool isLatin1 = false;         // a text that is not UTF-8
+    std::optional<std::uint64_t>
+        byteSize; // of bytes: `value` is the hexadecimal of the first, `ascii` the same as text
+    std::string ascii;
+    FourCC chunk = 0;
+    std::int64_t offset = 0;
+
+    /// "bext.description", "cue[3].label".
+    std::string fullName() const { return place + (name.empty() || name.front() == '[' ? "" : ".") + name; }
+};
+
+/// Collects fields, and gives those of the same name different ones: "info.IART", "info.IART[1]".
+class MetaFields {
+public:
+    /// The rate tells the time of numbers of frames; 0 where it is not known.
+    explicit MetaFields(double sampleRate) : sampleRate_(sampleRate) {}
+
+    /// From now on fields are of this chunk.
+    void enter(const MetaChunk& chunk, std::string_view group);
+    /// The same, of a chunk that says more of what others tell under the group.
+    void enterShared(const MetaChunk& chunk, std::string_view group);
+
+    /// Nothing for an empty text. Bytes that are not UTF-8 are taken for Latin-1.
+    void text(std::string_view name, std::string_view bytes, std::string_view words = "");
+    template <class Number>
+        requires std::integral<Number> || std::floating_point<Number>
+    void number(std::string_view name, Number value, std::string_view words = "")
+    {
+        if constexpr (std::floating_point<Number>)
+            add(name, double{value}).words = words;
+        else if constexpr (std::unsigned_integral<Number>)
+            add(name, std::uint64_t{value}).words = words;
+        else
+            add(name, std::int64_t{value}).words = words;
+    }
+    /// A place in the sound or a length of it.
+    void frames(std::string_view name, std::uint64_t frames);
+    void frames(std::string_view name, double frames);
+    /// All bytes in hexadecimal.
+    void hex(std::string_view name, BytesView bytes);
+    /// The first bytes of what is not understood; nothing of no bytes.
+    void preview(std::string_view name, BytesView bytes, std::uint64_t size, std::string_view words = "");
+    /// What follows the fields of a chunk: nothing of zeros.
+    void behind(BytesView bytes);
+    /// Nothing of 0.
+    void missing(std::uint64_t count);
+
+    std::vector<MetaField> take() { return std::move(fields_); }
+
+private:
+    MetaField& add(std::string_view name, MetaField::Value value);
+
+    double sampleRate_;
+    MetaField here_; // the parts that fields share
+    std::map<std::string, int, std::less<>> places_, names_;
+    std::vector<MetaField> fields_;
+};
+
+/// `name[index].` ahead of the fields of one item of several.
+std::string itemName(std::string_view name, std::size_t index);

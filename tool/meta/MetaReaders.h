@@ -1,0 +1,58 @@
+// How the metadata chunks of each container become fields.
+#pragma once
+
+#include "tool/meta/MetaFields.h"
+
+#include <bit>
+#include <span>
+
+/// All chunks of a file that may be metadata, in their order.
+struct MetaSource {
+    std::vector<MetaChunk> chunks;
+    std::endian order = std::endian::big; // of the numbers in them
+
+    /// The first chunk of an id that is held; null when there is none.
+    const MetaChunk* find(FourCC id) const;
+
+    // What chunks refer to in others, read once however many ask:
+
+    /// The index that a point has in "cue ", by its id.
+    const std::map<std::uint32_t, std::size_t>& cueIndices() const;
+    /// In frames, of the markers of "MARK", by their ids.
+    const std::map<std::int16_t, std::uint32_t>& markerPositions() const;
+    /// Of the texts of "strg", by their ids; not of more bytes than that chunk has, since they may overlap.
+    const std::map<std::uint32_t, std::string>& texts() const;
+
+private:
+    mutable std::optional<std::map<std::uint32_t, std::size_t>> cueIndices_;
+    mutable std::optional<std::map<std::int16_t, std::uint32_t>> markerPositions_;
+    mutable std::optional<std::map<std::uint32_t, std::string>> texts_;
+};
+
+/// Puts what a chunk says into fields. False, with no field, when it is not what its id promises.
+using MetaRead = bool (*)(const MetaChunk& chunk, const MetaSource& source, MetaFields& fields);
+
+struct MetaReader {
+    FourCC id = 0;
+    std::string_view group; // ahead of the names of its fields
+    MetaRead read = nullptr;
+};
+
+std::span<const MetaReader> waveReaders(); // of RIFF, RF64, BW64, RIFX and Wave64
+std::span<const MetaReader> aiffReaders();
+std::span<const MetaReader> cafReaders();
+
+// Of several containers:
+
+/// XML as fields by the path of each element; as one text where it is not well-formed.
+bool readIXML(const MetaChunk& chunk, const MetaSource& source, MetaFields& fields);
+/// How many elements of each kind an ADM document has.
+bool readADM(const MetaChunk& chunk, const MetaSource& source, MetaFields& fields);
+/// The whole body up to NULs at its end.
+bool readText(const MetaChunk& chunk, const MetaSource& source, MetaFields& fields);
+bool readHex(const MetaChunk& chunk, const MetaSource& source, MetaFields& fields);
+bool readID3(const MetaChunk& chunk, const MetaSource& source, MetaFields& fields);
+/// The size and the first bytes of what is for other programs.
+bool readPreview(const MetaChunk& chunk, const MetaSource& source, MetaFields& fields);
+/// "PEAK": the extreme of each channel, with 8 bytes ahead of them.
+bool readPeaks(const MetaChunk& chunk, const MetaSource& source, MetaFields& fields);

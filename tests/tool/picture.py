@@ -19,16 +19,20 @@ libpng.png_image_finish_read.argtypes = [ctypes.c_void_p, ctypes.c_void_p, ctype
                                          ctypes.c_void_p]
 
 
-def decoded_png(data):
-    """Rows of (red, green, blue, alpha)."""
+def pixels_of_png(data):
+    """Bytes of red, green, blue and alpha of each pixel, and the pixels in a row."""
     image = Image(version=1)
     assert libpng.png_image_begin_read_from_memory(ctypes.byref(image), data, len(data)), image.message
     image.format = FORMAT_RGBA
     pixels = ctypes.create_string_buffer(image.width * image.height * 4)
     assert libpng.png_image_finish_read(ctypes.byref(image), None, pixels, image.width * 4, None), image.message
-    flat = pixels.raw
-    return [[tuple(flat[at:at + 4]) for at in range(row, row + image.width * 4, 4)]
-            for row in range(0, len(flat) - 1, image.width * 4)]
+    return pixels.raw[:-1], image.width
+
+
+def decoded_png(data):
+    """Rows of (red, green, blue, alpha)."""
+    flat, width = pixels_of_png(data)
+    return [[tuple(flat[at:at + 4]) for at in range(row, row + width * 4, 4)] for row in range(0, len(flat), width * 4)]
 
 
 class WhiteOnBlack:

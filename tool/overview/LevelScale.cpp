@@ -10,10 +10,10 @@ namespace {
 constexpr float kLeastDistance = 15; // between labels
 constexpr int kStep = 6;             // decibels
 
-// Decibels of full scale, to a tenth.
+// Decibels of full scale, to a tenth, which three digits leave no room for.
 std::string labelOf(double decibels)
 {
-    const double shown = std::round(decibels * 10) / 10;
+    const double shown = std::abs(decibels) < 99.95 ? std::round(decibels * 10) / 10 : std::round(decibels);
     if (shown == 0)
         return "0";
     const char* const sign = shown < 0 ? "\u2212" : "+";

@@ -13,10 +13,10 @@ constexpr int kTimeStripHeight = 27;
 constexpr int kLowestWithTimeStrip = 72; // below, the wave gets all of the height
 constexpr int kLeastLane = 8;
 constexpr int kScaleWidth = 44;
-constexpr int kNarrowestWithLabels = 120; // beside the labels
-constexpr float kUnitEnd = 30;            // of the corner below the scale
+constexpr int kNarrowestWithLabels = 120, kNarrowestWithScale = 40; // beside the labels
+constexpr float kUnitEnd = 30;                                      // of the corner below the scale
 constexpr float kHairline = 1;
-constexpr float kLeastBetweenLabels = 12; // from baseline to baseline
+constexpr float kLeastBetweenLabels = 14; // from baseline to baseline
 constexpr float kEdge = 2;                // between a label and the picture's
 constexpr float kGapBetweenTimes = 6;
 constexpr float kMarkHeight = 3;
@@ -213,13 +213,14 @@ PictureFrame::PictureFrame(const PictureSettings& settings, const std::vector<So
             if (!label.empty())
                 widest = std::max(widest, broadestWidth(label, kLabelHeight));
     plotHeight = height - (height < kLowestWithTimeStrip ? 0 : kTimeStripHeight);
-    const int names = static_cast<int>(std::ceil(kLabelGap + widest)), scaleWidth = settings.scale ? kScaleWidth : 0;
+    hasScale = settings.scale && width >= kScaleWidth + kNarrowestWithScale;
+    const int names = static_cast<int>(std::ceil(kLabelGap + widest)), scaleWidth = hasScale ? kScaleWidth : 0;
     if (widest > 0 && width - names - scaleWidth >= kNarrowestWithLabels &&
         plotHeight >= static_cast<int>(kLeastBetweenLabels)) {
         labelsEnd = names;
-        left = names + (settings.scale ? 0 : static_cast<int>(kLabelGap));
+        left = names + (hasScale ? 0 : static_cast<int>(kLabelGap));
     }
-    left += std::min(scaleWidth, width / 2);
+    left += scaleWidth;
     plotWidth = width - left;
 }
 
@@ -257,11 +258,11 @@ WaveformPicture pictureOf(const PictureFrame& frame, const DrawnSound& sound, co
         picture.lanes.push_back(LaneDrawing(picture, sound, scale).draw(sound.lanes[i]));
         if (i > 0)
             picture.borders.push_back(top);
-        if (settings.scale)
+        if (frame.hasScale)
             for (const Level& level : scale.levels())
                 levels.add(level.y, level.label);
     }
-    if (settings.scale && frame.hasTimeAxis())
+    if (frame.hasScale && frame.hasTimeAxis())
         picture.unit = {static_cast<float>(frame.plotHeight) + kLabelBaseline, "dB"};
     nameLanes(picture, sound);
     if (frame.hasTimeAxis())

@@ -26,7 +26,8 @@ struct PictureFrame {
     // The wave's part of the picture. The strip of the time axis lies below it unless the picture is too low, the
     // names of the lanes and the amplitude scale to the left of it.
     int left = 0, plotWidth = 0, plotHeight = 0;
-    int labelsEnd = 0; // the right edge of the lanes' names; 0: there is no room for them
+    bool hasScale = false; // asked for, and there is room
+    int labelsEnd = 0;     // the right edge of the lanes' names; 0: there is no room for them
 
     /// Columns of pixels in the PNG.
     int columns() const { return plotWidth * scaleFactor; }

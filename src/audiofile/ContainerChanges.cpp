@@ -1,5 +1,7 @@
 #include "audiofile/ContainerChanges.h"
 
+#include "audiofile/SoundProblem.h"
+
 #include <cerrno>
 
 using Kind = ContainerProblem::Kind;
@@ -31,6 +33,8 @@ ContainerProblem OpenContainer(CAudioFileIO& file, const CFileRef& ref, unsigned
         return ContainerProblem::ofStatus(status);
     if (file.GetEOF() == 0)
         return {Kind::empty};
+    if (!file.TakesChunks() && file.InfoStatus() == kStatusEndOfFile)
+        return SoundProblem(file);
     if (!file.TakesChunks())
         return {file.HasChunks() ? Kind::onlyRead : Kind::noContainer};
     return {};

@@ -13,6 +13,11 @@ struct [[nodiscard]] ContainerProblem {
         status,      // a call of the library failed
         empty,       // the file is
         noContainer, // that is known
+        unknown,     // nor any other kind of sound
+        headerCut,   // the file ends within its header
+        noFormat,    // the chunk `id`, which says what the samples are, is missing or too short
+        noSound,     // the chunk `id`, which holds the samples, is missing; 0 where they have none
+        noIndex,     // the part `id`, which says where the samples are, is missing
         onlyRead,    // its kind is (RIFX, Wave64)
         chunks,      // cannot be walked
         reading,     // bodies cannot be read to compare them

@@ -149,7 +149,15 @@ bool CFileRef::GetFileName(char* buffer, long size) const
     if (buffer == nullptr || size <= 0)
         return false;
     buffer[0] = '\0';
-    return CopyFileName().getFileSystemRepresentation(buffer, static_cast<std::size_t>(size));
+    const String name = CopyFileName();
+    if (!name.isNull() || !valid_)
+        return name.getFileSystemRepresentation(buffer, static_cast<std::size_t>(size));
+    const std::string& path = url_->posixPath(); // of a URL that was made of bytes
+    const std::string_view bytes = std::string_view(path).substr(path.rfind('/') + 1);
+    if (bytes.empty() || bytes.size() >= static_cast<std::size_t>(size))
+        return false;
+    buffer[bytes.copy(buffer, bytes.size())] = '\0';
+    return true;
 }
 
 bool CFileRef::UnicodeFileName(UnicodeName* name) const

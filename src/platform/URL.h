@@ -40,6 +40,10 @@ public:
     /// volume, or for a name that is "." or "..".
     static URLRef createWithFileSystemPath(const String& path, PathStyle style, bool isDirectory,
                                            URLRef base = nullptr);
+    /// A file URL from an absolute path as the file system has it, in bytes that need not be UTF-8. Where they are not,
+    /// the URL has no path as a String, no component and no extension, and the text of it is not read back; but
+    /// posixPath() has it, and so can the file be opened. Null for one that is not absolute or holds a NUL.
+    static URLRef createWithFileSystemBytes(std::string_view path, bool isDirectory);
     /// From a URL's text, in which characters beyond ASCII may stand unescaped. Without a scheme it is relative to
     /// `base`, and without a base too a path. Query and fragment stay in the text and are no part of the path.
     /// Null when it is not a valid URI reference. For one that names a file also null when it has no path, or with the
@@ -69,8 +73,8 @@ public:
     /// null when there is none: a URL of another scheme, a POSIX or colon path on another host, a colon path outside
     /// "/Volumes", or a path that the style would read back as another one (a name with "\" in Windows style).
     String copyFileSystemPath(PathStyle style) const;
-    /// What copyFileSystemPath gives in POSIX style, valid UTF-8 without a NUL and without a copy; empty for null. It
-    /// lives as long as the URL.
+    /// What copyFileSystemPath gives in POSIX style, without a NUL and without a copy; empty where there is no path on
+    /// this system. Valid UTF-8, unless it was made of other bytes. It lives as long as the URL.
     const std::string& posixPath() const;
     /// The last component of the path, decoded; "/" for the root; null for a URL of another scheme.
     String copyLastPathComponent() const;

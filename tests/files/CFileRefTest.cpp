@@ -1,5 +1,6 @@
 #include "files/CFileRef.h"
 #include "files/CFileUtilLocations.h"
+#include "platform/FileCoordination.h"
 #include "platform/PropertyList.h"
 #include "support/FaultInjection.h"
 #include "support/References.h"
@@ -8,6 +9,7 @@
 #include <gtest/gtest.h>
 
 #include <cstring>
+#include <fstream>
 
 namespace fs = std::filesystem;
 using platform::String;
@@ -269,6 +271,21 @@ TEST(CFileRef, ResolvesLinksAndAliasFiles)
     alias = file(folder / "alias");
     EXPECT_FALSE(alias.ResolveAlias(false));
     EXPECT_EQ(shown(alias), folder / "alias");
+}
+
+TEST(CFileRef, FilesWhoseNamesAreNoTextAreReachedByURLsOfTheirBytes)
+{
+    const TemporaryFolder folder;
+    const auto ref = [&](const std::string& name) {
+        return CFileRef(platform::URL::createWithFileSystemBytes(folder / name, false));
+    };
+    const CFileRef a = ref("\xE4.wav"), b = ref("\xE5.wav");
+    std::ofstream(a.GetPath()) << "x";
+    EXPECT_TRUE(a.IsFile() && !b.Exists());
+    EXPECT_TRUE(a == ref("\xE4.wav") && a != b && (a < b) != (b < a));
+    EXPECT_NE(platform::CoordinatedItem(a.URL()).key(), platform::CoordinatedItem(b.URL()).key());
+    std::string extension;
+    EXPECT_TRUE(a.GetExtension(extension) && extension == "wav");
 }
 
 TEST(CFileRef, PropertyListsHoldBookmarkAndURL)

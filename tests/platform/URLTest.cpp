@@ -64,6 +64,19 @@ TEST(URL, PathsBecomeTextAndComeBack)
               nullptr);
 }
 
+TEST(URL, PathsThatAreNoTextAreKeptAsBytes)
+{
+    const URLRef url = URL::createWithFileSystemBytes("/a\xC4//\xE4.wav", false);
+    ASSERT_NE(url, nullptr);
+    EXPECT_EQ(url->posixPath(), "/a\xC4/\xE4.wav");
+    EXPECT_EQ(url->string(), "file:///a%C4/%E4.wav");
+    EXPECT_EQ(url->deletingLastPathComponent()->posixPath(), "/a\xC4");
+    EXPECT_TRUE(url->copyFileSystemPath(PathStyle::posix).isNull() && url->copyLastPathComponent().isNull());
+    EXPECT_EQ(*URL::createWithFileSystemBytes("/\u00E4/", true), *fromPath("/\u00E4", true));
+    for (const std::string& refused : {""s, "a"s, "/a\0b"s})
+        EXPECT_EQ(URL::createWithFileSystemBytes(refused, false), nullptr);
+}
+
 TEST(URL, TextIsReadStrictlyAndKeptInOneForm)
 {
     struct Case {

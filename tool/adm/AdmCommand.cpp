@@ -113,7 +113,7 @@ public:
                 if (!arguments_.isCheck)
                     return [this, &areFine, file] { areFine = show(file) && areFine; };
                 return [this, &areFine, path = file.path, found = check(file)] {
-                    tell(path, found);
+                    tell(shownName(path), found);
                     areFine = areFine && found.empty();
                 };
             },
@@ -132,9 +132,9 @@ private:
 
     bool show(const FoundFile& file)
     {
-        const std::string& path = file.path;
-        const FileAccess access = accessForReading(path, {.quiet = options_.quiet});
-        AdmSource source(path);
+        const std::string path = shownName(file.path);
+        const FileAccess access = accessForReading(file.path, {.quiet = options_.quiet});
+        AdmSource source(file.path);
         requireMeant(file, source);
         ReadDocument read = readDocument(source, arguments_.isLenient ? Diagnose::yes : Diagnose::no);
         // To know the place of everything costs a ninth of the time, which only documents with a problem pay.
@@ -263,7 +263,8 @@ void declareAdm(CommandLine& commandLine)
     static AdmArguments arguments;
     Verb& verb = commandLine.addVerb("adm", "Show what the ADM documents of audio files, or in XML files, describe",
                                      [&commandLine] { return AdmCommand(arguments, commandLine.output()).run(); });
-    CommandLine::addFiles(verb, arguments.files).describe("Audio files, folders of them, and XML files");
+    CommandLine::addFilesOrInput(verb, arguments.files)
+        .describe("Audio files, folders of them, and XML files; \"-\" is standard input");
     addThreads(verb, arguments.threads);
     verb.addFlag("--long", arguments.isLong, "Show every block, with its ID");
     verb.addFlag("--lenient", arguments.isLenient, "Let pass what can be passed over, and list it");

@@ -133,7 +133,7 @@ std::string listFile(const std::string& path, ChunkListWriter& writer, bool quie
         },
         &extent);
     if (status != kStatusOK && !begun)
-        throw Failure("its container header cannot be read");
+        failForSound(path, status);
     if (!begun)
         writer.begin(extent);
     const std::string error = status != kStatusOK ? "a chunk header cannot be read" : "";
@@ -152,7 +152,7 @@ bool runList(const FileArguments& files, const OutputOptions& options)
         files, {.quiet = options.quiet},
         [&](const FoundFile& file) -> FileRest {
             const bool follows = table && !isFirst;
-            ChunkListWriter writer(options, json, file.path, several, follows);
+            ChunkListWriter writer(options, json, shownName(file.path), several, follows);
             const std::string error = listFile(file.path, writer, options.quiet);
             isFirst = false;
             if (!error.empty()) {
@@ -176,7 +176,7 @@ void declareChunks(CommandLine& commandLine)
     static FileArguments files;
     Verb& verb = commandLine.addVerb("chunks", "List the chunks of audio files; get, add or remove one",
                                      [&commandLine] { return runList(files, commandLine.output()); });
-    CommandLine::addFiles(verb, files);
+    CommandLine::addFilesOrInput(verb, files);
     declareChunksGet(commandLine, verb);
     declareChunkEdits(commandLine, verb);
 }

@@ -8,6 +8,7 @@
 #include "tool/shared/input/InputFile.h"
 #include "tool/shared/output/Failure.h"
 #include "tool/shared/output/JsonRecords.h"
+#include "tool/shared/output/ShownName.h"
 
 #include <cerrno>
 #include <fcntl.h>
@@ -76,7 +77,7 @@ void print(const EditArguments& arguments, const OutputOptions& output, const Ed
     if (output.wantsJson()) {
         writeRecord(output, [&](JsonWriter& json) {
             json.beginObject();
-            json.member("path", arguments.file);
+            json.member("path", shownName(arguments.file));
             json.member("action", report.action);
             json.member("id", fourCCText(arguments.id));
             json.member("count", report.count);
@@ -85,7 +86,7 @@ void print(const EditArguments& arguments, const OutputOptions& output, const Ed
             if (adds)
                 json.member("replaced", report.replaced);
             json.member("dryRun", arguments.options.dryRun);
-            json.knownMember("where", report.where).knownMember("backup", report.backup);
+            json.knownMember("where", shownName(report.where)).knownMember("backup", shownName(report.backup));
             json.endObject();
         });
     } else if (!output.quiet) {

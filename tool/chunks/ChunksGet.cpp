@@ -9,6 +9,7 @@
 #include "tool/shared/output/Failure.h"
 #include "tool/shared/output/JsonRecords.h"
 #include "tool/shared/output/Progress.h"
+#include "tool/shared/output/ShownName.h"
 #include "tool/shared/output/UnseenCharacters.h"
 
 #include <algorithm>
@@ -78,7 +79,7 @@ void getFromAnywhere(const GetArguments& arguments, const OutputOptions& options
     put([&](const Sink& sink) { sink(textOf(chunk.body)); }, arguments);
     if (options.wantsJson())
         writeRecord(options, [&](JsonWriter& json) {
-            json.beginObject().member("path", arguments.file).member("id", fourCCText(arguments.id));
+            json.beginObject().member("path", shownName(arguments.file)).member("id", fourCCText(arguments.id));
             json.member("source", chunk.source).member("size", chunk.body.size()).endObject();
         });
 }
@@ -94,7 +95,7 @@ void getChunk(const GetArguments& arguments, const OutputOptions& options)
     put([&](const Sink& sink) { copyBody(file, chunk.offset, chunk.size, options.quiet, sink); }, arguments);
     if (options.wantsJson())
         writeRecord(options, [&](JsonWriter& json) {
-            json.beginObject().member("path", arguments.file).member("id", fourCCText(arguments.id));
+            json.beginObject().member("path", shownName(arguments.file)).member("id", fourCCText(arguments.id));
             json.member("offset", chunk.header).member("size", chunk.size).endObject();
         });
 }
@@ -109,11 +110,13 @@ void declareChunksGet(CommandLine& commandLine, Verb& chunks)
         [&commandLine] {
             if (commandLine.output().wantsJson() && (arguments.out.empty() || arguments.out == "-"))
                 throw UsageError("--json needs -o OUT, since the chunk itself goes to standard output");
+            if (!arguments.sidecar.empty())
+                requireNoInput(arguments.file);
             return reportingRecord(arguments.file, commandLine.output(),
                                    [&] { getChunk(arguments, commandLine.output()); });
         },
         &chunks);
-    CommandLine::addFile(verb, arguments.file).required();
+    CommandLine::addFileOrInput(verb, arguments.file).required();
     CommandLine::addChunkId(verb, arguments.id).required();
     CommandLine::addPath(verb, "-o,--output", arguments.out, "The file to write").label("OUT");
     CommandLine::addForceOption(verb, arguments.existing);

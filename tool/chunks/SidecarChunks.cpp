@@ -135,13 +135,13 @@ SidecarChunk readFromAnywhere(const std::string& path, FourCC id, const std::str
     const SidecarNames names(file, extension);
     if (isRegularFile(names.metadata) && !isTorn(names.metadata)) {
         if (!keepsItsChunks(names.metadata))
-            return {contentOf(names.metadata), names.metadata};
+            return {contentOf(names.metadata), asGiven(names.metadata, path)};
         if (auto body = chunkIn(names.metadata, id))
-            return {std::move(*body), names.metadata};
+            return {std::move(*body), asGiven(names.metadata, path)};
     }
     if (isRegularFile(names.raw) && keepsItsChunks(names.raw))
         if (auto body = chunkIn(names.raw, id))
-            return {std::move(*body), names.raw};
+            return {std::move(*body), asGiven(names.raw, path)};
     if (keepsItsChunks(file))
         if (auto body = chunkIn(file, id))
             return {std::move(*body), path};
@@ -149,7 +149,8 @@ SidecarChunk readFromAnywhere(const std::string& path, FourCC id, const std::str
 }
 
 Sidecars::Sidecars(const std::string& path, const std::string& extension, const EditOptions& options)
-    : file_(resolvedPath(path)),
+    : given_(path),
+      file_(resolvedPath(path)),
       options_(options)
 {
     const SidecarNames names(file_, extension);
@@ -166,7 +167,7 @@ std::optional<std::string> Sidecars::objection() const
     requireOK(file.Open(referenceTo(raw_), 0));
     if (file.Info().fileType == 0 && !file.HasChunks())
         return std::nullopt;
-    return raw_ + " is an audio file of its own, and would be lost as an older copy of the chunk";
+    return asGiven(raw_, given_) + " is an audio file of its own, and would be lost as an older copy of the chunk";
 }
 
 std::string Sidecars::add(FourCC id, const Bytes& body, bool force)
@@ -176,10 +177,10 @@ std::string Sidecars::add(FourCC id, const Bytes& body, bool force)
     try {
         addToMetadata(id, body, force);
     } catch (const Failure& failure) {
-        failToChange(metadata_, failure);
+        failToChange(asGiven(metadata_, given_), failure);
     }
     rewriteRaw(body);
-    return metadata_;
+    return asGiven(metadata_, given_);
 }
 
 void Sidecars::addToMetadata(FourCC id, const Bytes& body, bool force)
@@ -252,7 +253,7 @@ void Sidecars::rewriteRaw(const Bytes& body)
                 requireOK(file.Close());
             });
     } catch (const Failure& failure) {
-        failToChange(raw_, failure);
+        failToChange(asGiven(raw_, given_), failure);
     }
 }
 
@@ -263,7 +264,7 @@ void Sidecars::removeRaw()
     const FileAccess access =
         accessForWriting(raw_, platform::FileCoordinator::WritingOptions::none, options_.waiting());
     if (::unlink(raw_.c_str()) != 0 && errno != ENOENT)
-        throw Failure(raw_ + ": " + systemErrorText(errno));
+        throw Failure(asGiven(raw_, given_) + ": " + systemErrorText(errno));
     synchronizeFolderOf(raw_);
 }
 
@@ -275,7 +276,7 @@ SidecarRemoval Sidecars::remove(FourCC id)
         if (!isTorn(edit.target()) && keepsItsChunks(edit.target()))
             removal.count = surveyOf(edit.target(), id).count;
         if (removal.count > 0) {
-            removal.where = metadata_;
+            removal.where = asGiven(metadata_, given_);
             if (!options_.dryRun)
                 edit.apply(EditScope::chunk(id), [&](const std::string& path) {
                     requireNone(RemoveChunksFrom(referenceTo(path), id, removal.count));
@@ -284,7 +285,7 @@ SidecarRemoval Sidecars::remove(FourCC id)
     }
     if (isRegularFile(raw_)) {
         ++removal.count;
-        removal.where = raw_;
+        removal.where = asGiven(raw_, given_);
         removeRaw();
     }
     return removal;

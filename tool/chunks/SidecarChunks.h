@@ -46,7 +46,8 @@ public:
     std::optional<std::string> objection() const;
 
     /// Puts the chunk into the metadata sidecar, which is made where there is none, in the place of those of its id; a
-    /// raw sidecar that is there is written anew. Returns the path of the metadata sidecar.
+    /// raw sidecar that is there is written anew. Returns the path of the metadata sidecar in the words
+    /// of the file's.
     std::string add(FourCC id, const Bytes& body, bool force);
     SidecarRemoval remove(FourCC id);
     /// Does nothing where there is none.
@@ -57,7 +58,7 @@ private:
     bool createMetadata(FourCC id, const Bytes& body);
     void rewriteRaw(const Bytes& body);
 
-    std::string file_;
+    std::string given_, file_;
     std::string metadata_, raw_; // empty: the name is that of another of the three, which must not pass for two
     EditOptions options_;
 };

@@ -7,6 +7,7 @@
 #include "tool/shared/edits/OutputFile.h"
 #include "tool/shared/input/FileByFile.h"
 #include "tool/shared/input/InputFile.h"
+#include "tool/shared/input/StandardInput.h"
 
 #include <array>
 #include <unistd.h>
@@ -67,6 +68,10 @@ bool runDecode(DecodeArguments& arguments, OutputOptions output)
     std::vector<std::string> names;
     if (!reportingRecord(arguments.files.listName(), output, [&] { names = allNames(arguments.files); }))
         return false;
+    if (arguments.out.empty() || isDecodeFolder(arguments.out))
+        for (const std::string& name : names)
+            if (name == kStandardInput)
+                throw UsageError("what comes from standard input has no name to decode it to: -o OUT names a file");
     DecodeTargets targets(arguments.out, *arguments.options.wishes.format);
     DecodeReport report(toOutput ? Form::none : outputForm(output), output);
     const FoundFiles found{names.front(), targets.plan(names)};
@@ -124,7 +129,7 @@ void declareDecode(CommandLine& commandLine)
     static DecodeArguments arguments;
     Verb& verb = commandLine.addVerb("decode", "Decode audio files of any format to linear PCM",
                                      [&commandLine] { return runDecode(arguments, commandLine.output()); });
-    CommandLine::addFiles(verb, arguments.files);
+    CommandLine::addFilesOrInput(verb, arguments.files);
     addThreads(verb, arguments.threads);
     CommandLine::addPath(verb, "-o,--output", arguments.out,
                          "The file or folder to write to, \"-\" for standard output; else the current folder")

@@ -3,9 +3,11 @@
 #include "tool/decode/DecodeMetadata.h"
 #include "tool/shared/access/FileAccess.h"
 #include "tool/shared/edits/OutputFile.h"
+#include "tool/shared/input/InputFile.h"
 #include "tool/shared/output/Failure.h"
 #include "tool/shared/output/Output.h"
 #include "tool/shared/output/Progress.h"
+#include "tool/shared/output/ShownName.h"
 #include "tool/shared/output/UnseenCharacters.h"
 
 #include <fmt/format.h>
@@ -18,7 +20,7 @@ namespace {
 /// A file, or standard output; which has nothing behind it once it failed.
 class Target {
 public:
-    Target(const DecodeJob& job, bool force)
+    Target(const DecodeJob& job, bool force) : out_(job.output)
     {
         if (job.output != "-")
             file_ = std::make_unique<OutputFile>(job.output, job.file,
@@ -54,10 +56,11 @@ private:
                                 : accessForWriting(path, platform::FileCoordinator::WritingOptions::forReplacing,
                                                    {.quiet = quiet});
         } catch (const Failure& failure) {
-            throw Failure(path + " " + failure.what());
+            throw Failure(asGiven(path, out_) + " " + failure.what());
         }
     }
 
+    std::string out_;
     std::unique_ptr<OutputFile> file_;
 };
 
@@ -144,7 +147,7 @@ DecodeResult decodeFile(const DecodeJob& job, const DecodeOptions& options)
     if (kept.hasTexts && !tagsFollow)
         tags.forgetTexts();
     const DecodeFrame frame(sound, format, std::move(kept.chunks));
-    DecodeResult result{.output = job.output,
+    DecodeResult result{.output = shownName(job.output),
                         .container = frame.container(),
                         .sound = sound,
                         .clippedSamples = 0,

@@ -3,6 +3,7 @@
 #include "audiofile/BusFormats.h"
 #include "media/samples/SampleExtremes.h"
 #include "tool/shared/access/FileAccess.h"
+#include "tool/shared/input/FileLocation.h"
 #include "tool/shared/input/InputFile.h"
 #include "tool/shared/output/ClockTime.h"
 #include "tool/shared/output/Failure.h"
@@ -51,10 +52,13 @@ void DecodeSource::open(const std::string& path)
     requireRegularFile(path);
     std::int32_t status = kStatusOK;
     platform::Error error;
-    reader_ = ConvertingReader::open(*coordinatedURL(path), &status, &error);
-    if (!reader_)
-        throw OtherKind(std::filesystem::file_size(path) == 0 ? "is empty" : error.description,
-                        OtherKind::Kind::unknown);
+    reader_ = ConvertingReader::open(*fileLocation(path), &status, &error);
+    if (!reader_) {
+        CAudioFileIO file; // which says best what is wrong with it
+        openAudio(file, path);
+        requireDecoder(file);
+        throw OtherKind(error.description, OtherKind::Kind::unknown);
+    }
     reader_->compareChecksum();
     sourceRate_ = reader_->clientFormat().sampleRate;
 }

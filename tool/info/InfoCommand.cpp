@@ -154,7 +154,7 @@ void writeJson(JsonWriter& json, const std::string& path, const Description& des
     if (info.framesAreStated)
         json.member("framesAreStated", true); // no decoder could count them
     if (facts.stereo) {
-        json.member("stereoPartner", facts.stereo->partner);
+        json.member("stereoPartner", shownName(facts.stereo->partner));
         json.member("stereoPartnerExists", facts.stereo->partnerExists);
     }
     json.endObject();
@@ -221,7 +221,8 @@ private:
             const auto& stereo = facts.stereo;
             row.push_back(typeByNameText(facts));
             row.push_back(localDateText(facts.modified));
-            row.push_back(stereo ? printable(stereo->partner) + (stereo->partnerExists ? "" : " (missing)") : "");
+            row.push_back(stereo ? printable(shownName(stereo->partner)) + (stereo->partnerExists ? "" : " (missing)")
+                                 : "");
         }
         if (wanted_.wantsMD5)
             row.push_back(md5);
@@ -237,7 +238,7 @@ private:
                       info.sampleRate, formatWords(info), info.channels);
         if (wanted_.isLong)
             output_.print("\t{}\t{}\t{}\t{}", typeByNameText(facts), dateText(facts.modified),
-                          facts.stereo ? printable(facts.stereo->partner) : "",
+                          facts.stereo ? printable(shownName(facts.stereo->partner)) : "",
                           !facts.stereo                 ? ""
                           : facts.stereo->partnerExists ? "there"
                                                         : "missing");
@@ -277,7 +278,7 @@ void declareInfo(CommandLine& commandLine)
     static InfoOptions wanted;
     Verb& verb = commandLine.addVerb("info", "Say what audio files are: length, rate, format, channels",
                                      [&commandLine] { return runInfo(files, wanted, commandLine.output()); });
-    CommandLine::addFiles(verb, files);
+    CommandLine::addFilesOrInput(verb, files);
     addThreads(verb, wanted.threads);
     const Argument isLong = verb.addFlag(
         "-l,--long", wanted.isLong,

@@ -8,8 +8,10 @@
 #include "tool/shared/access/Parties.h"
 #include "tool/shared/arguments/CommandLine.h"
 #include "tool/shared/arguments/TimeoutOption.h"
+#include "tool/shared/input/FileLocation.h"
 #include "tool/shared/output/Failure.h"
 #include "tool/shared/output/JsonRecords.h"
+#include "tool/shared/output/ShownName.h"
 
 #include <algorithm>
 #include <array>
@@ -135,16 +137,16 @@ void sayHeld(const LockArguments& arguments, const OutputOptions& options)
     switch (outputForm(options)) {
     case Form::json:
         writeRecord(options, [&](JsonWriter& json) {
-            json.beginObject().member("path", arguments.file).member("lock", arguments.kind());
+            json.beginObject().member("path", shownName(arguments.file)).member("lock", arguments.kind());
             json.member("held", true).endObject();
         });
         break;
     case Form::table:
-        output.print("{}: {} lock held; end of input{} releases it\n", printable(arguments.file), arguments.kind(),
-                     isTerminal(STDIN_FILENO) ? " (Ctrl-D)" : "");
+        output.print("{}: {} lock held; end of input{} releases it\n", printable(shownName(arguments.file)),
+                     arguments.kind(), isTerminal(STDIN_FILENO) ? " (Ctrl-D)" : "");
         break;
     case Form::lines:
-        output.print("{}\t{}\theld\n", printable(arguments.file), arguments.kind());
+        output.print("{}\t{}\theld\n", printable(shownName(arguments.file)), arguments.kind());
         break;
     case Form::none:
         break;
@@ -164,7 +166,7 @@ void awaitEndOfInput()
 /// The exit status.
 int lockAndRun(const LockArguments& arguments, const OutputOptions& options)
 {
-    const platform::URLRef url = coordinatedURL(arguments.file);
+    const platform::URLRef url = fileLocation(arguments.file);
     // Not taken for had: two commands under that lock, each with one of its own, would meet. Nor for reading: a writer
     // that waits in between would hold back what it waits for.
     if (const auto lock = lockAbove(url))

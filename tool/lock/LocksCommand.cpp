@@ -3,6 +3,7 @@
 #include "tool/shared/access/FileAccess.h"
 #include "tool/shared/access/Parties.h"
 #include "tool/shared/arguments/CommandLine.h"
+#include "tool/shared/input/FileLocation.h"
 #include "tool/shared/output/Failure.h"
 #include "tool/shared/output/JsonRecords.h"
 #include "tool/shared/output/Table.h"
@@ -87,7 +88,7 @@ bool listFiles(const std::vector<std::string>& files, PartiesWriter& writer)
     bool good = true;
     for (const std::string& path : files) {
         try {
-            const auto number = platform::coordinationItemNumber(coordinatedURL(path));
+            const auto number = platform::coordinationItemNumber(fileLocation(path));
             for (const CoordinationParty& party : parties)
                 if (party.itemNumber == number)
                     writer.add(path, party);

@@ -138,7 +138,7 @@ void requireSenseOfData(const OverviewArguments& arguments, const Verb& verb)
 
 void declareArguments(Verb& verb, OverviewArguments& arguments)
 {
-    CommandLine::addFiles(verb, arguments.files);
+    CommandLine::addFilesOrInput(verb, arguments.files);
     addThreads(verb, arguments.threads);
     addPictureOptions(verb, arguments);
     addDataOptions(verb, arguments);

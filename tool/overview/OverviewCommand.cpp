@@ -69,7 +69,7 @@ void writePictures(const std::string& path, const WaveformPicture& picture, cons
                    [&](const Sink& sink) { sink(pngOf(picture, arguments.colors)); });
     if (!arguments.svg.empty())
         writeBytes(arguments.svg, path, arguments.existing, [&](const Sink& sink) {
-            sink(svgOf(picture, arguments.colors, std::filesystem::path(path).filename().string()));
+            sink(svgOf(picture, arguments.colors, shownName(std::filesystem::path(path).filename().string())));
         });
 }
 
@@ -193,7 +193,7 @@ void tellOf(const std::string& path, Reading& reading, const OverviewArguments& 
         writePictures(path, *reading.picture, arguments);
     if (arguments.store)
         deeds.store = store(path, reading, arguments);
-    report.add(path, reading.overview, deeds);
+    report.add(shownName(path), reading.overview, deeds);
 }
 
 bool writeSheet(const ContactSheet& sheet, const OverviewArguments& arguments, OverviewReport& report)
@@ -211,7 +211,7 @@ bool runOverview(OverviewArguments& arguments, const Verb& verb, OutputOptions o
 {
     requireSense(arguments, verb, output);
     arguments.edit.quiet = output.quiet;
-    arguments.files.takesFolders = !arguments.store;
+    arguments.files.takesFolders = arguments.files.takesInput = !arguments.store;
     if (arguments.takesOutput()) // nothing else
         output.quiet = true;
     const bool hasSheet = !arguments.sheet.empty();

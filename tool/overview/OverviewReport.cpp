@@ -4,6 +4,7 @@
 #include "tool/shared/input/FolderWalk.h"
 #include "tool/shared/output/ClockTime.h"
 #include "tool/shared/output/DisplayWidth.h"
+#include "tool/shared/output/ShownName.h"
 #include "tool/shared/output/Terminal.h"
 
 #include <algorithm>
@@ -53,7 +54,7 @@ OverviewReport::OverviewReport(const OutputOptions& options, const FileArguments
 {
     const int most = std::max(columns_ / 3, 8);
     for (const std::string& path : files.names)
-        nameWidth_ = std::max(nameWidth_, displayWidth(printable(path)));
+        nameWidth_ = std::max(nameWidth_, displayWidth(printable(shownName(path))));
     const bool areKnown = files.list.empty() && std::ranges::none_of(files.names, isFolder);
     nameWidth_ = areKnown ? std::min(nameWidth_, most) : most;
 }

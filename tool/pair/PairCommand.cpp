@@ -68,8 +68,8 @@ bool runPair(const FileArguments& files, const OutputOptions& options)
             return [] {};
         seen.insert(half->partner);
         const bool isLeft = half->isLeft, hasPartner = half->partnerExists;
-        writer.add({isLeft ? file.path : half->partner, isLeft ? half->partner : file.path, isLeft || hasPartner,
-                    !isLeft || hasPartner});
+        const std::string own = shownName(file.path), partner = shownName(half->partner);
+        writer.add({isLeft ? own : partner, isLeft ? partner : own, isLeft || hasPartner, !isLeft || hasPartner});
         return [] {};
     };
     const bool good =

@@ -2,6 +2,7 @@
 
 #include "tool/shared/looptags/LoopTags.h"
 #include "tool/shared/output/Failure.h"
+#include "tool/shared/output/ShownName.h"
 
 #include <algorithm>
 #include <cctype>
@@ -98,15 +99,15 @@ void fill(ScanRecord& record, const LoopTags& tags, ScanForm form)
     record.kind = ScanRecord::loop;
     if (form == ScanForm::json) {
         JsonWriter json;
-        writeLoopTags(json, record.path, tags);
+        writeLoopTags(json, shownName(record.path), tags);
         record.text = json.text();
     } else if (form == ScanForm::csv) {
-        record.text = csvLine(record.path, tags);
+        record.text = csvLine(shownName(record.path), tags);
     } else if (form == ScanForm::table) {
         record.cells = cells(tags, {"tempo", "beatCount", "key", "signature", "instrumentType", "genre"});
-        record.cells.push_back(printable(record.path));
+        record.cells.push_back(printable(shownName(record.path)));
     } else if (form == ScanForm::lines) {
-        record.text = printable(record.path) + "\t" + loopContainerName(tags.fileType);
+        record.text = printable(shownName(record.path)) + "\t" + loopContainerName(tags.fileType);
         for (const std::string& cell : cells(tags, {"tempo", "beatCount", "key", "signature", "instrumentType",
                                                     "instrumentSubType", "genre", "descriptors"}))
             record.text += "\t" + cell;

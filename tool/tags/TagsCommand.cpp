@@ -80,7 +80,7 @@ void declareTags(CommandLine& commandLine)
     static unsigned threads = 0;
     Verb& verb = commandLine.addVerb("tags", "Show the loop tags of AIFF and CAF files; set, remove or copy some",
                                      [&commandLine] { return runTags(files, threads, commandLine.output()); });
-    CommandLine::addFiles(verb, files);
+    CommandLine::addFilesOrInput(verb, files);
     addThreads(verb, threads);
     declareTagsSet(commandLine, verb);
     declareTagsRemove(commandLine, verb);

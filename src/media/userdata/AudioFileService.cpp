@@ -22,17 +22,6 @@ std::int32_t failure()
     return status != kStatusOK ? status : kStatusIOError;
 }
 
-/// The URL's path as the file system takes it; empty when there is none.
-std::string pathOf(const URL& url)
-{
-    const String path = url.copyFileSystemPath(PathStyle::posix);
-    std::string bytes(path.maximumSizeOfFileSystemRepresentation(), '\0');
-    if (!path.getFileSystemRepresentation(bytes.data(), bytes.size()))
-        return {};
-    bytes.resize(std::char_traits<char>::length(bytes.data()));
-    return bytes;
-}
-
 } // namespace
 
 AudioFile::AudioFile(std::unique_ptr<Implementation> implementation)
@@ -62,7 +51,7 @@ std::unique_ptr<AudioFile> AudioFile::openToRead(const URL& url, std::int32_t* s
 
 std::unique_ptr<AudioFile> AudioFile::openAny(const URL& url, Permission permission, std::int32_t& result)
 {
-    const std::string path = pathOf(url);
+    const std::string& path = url.posixPath();
     if (path.empty()) {
         result = kStatusParameterError;
         return nullptr;
@@ -90,7 +79,7 @@ std::unique_ptr<AudioFile> AudioFile::create(const URL& url, FourCC fileType, co
 {
     std::int32_t ignored;
     std::int32_t& result = status != nullptr ? *status : ignored;
-    const std::string path = pathOf(url);
+    const std::string& path = url.posixPath();
     // Samples begin on a page, and filler ahead of them is for user data to come.
     const Bytes content = headerOf({.fileType = fileType,
                                     .format = format,

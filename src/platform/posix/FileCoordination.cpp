@@ -42,14 +42,21 @@ struct OpenAccess final : CoordinatedAccess {
     std::deque<ItemAccess> places;
 };
 
+std::optional<SHA256Digest> keyOf(const URL& url)
+{
+    if (const String path = String::fromUTF8(absolutePath(url)); !path.isNull())
+        return fileSystemRepresentationSHA256(resolvingSymbolicLinksInPath(path));
+    const URLRef resolved = resolvingSymbolicLinks(url);
+    return sha256(bytesOf(resolved ? resolved->posixPath() : absolutePath(url)));
+}
+
 } // namespace
 
 CoordinatedItem::CoordinatedItem(URLRef url) : url_(std::move(url))
 {
     if (!url_ || absolutePath(*url_).empty())
         return;
-    const auto key =
-        fileSystemRepresentationSHA256(resolvingSymbolicLinksInPath(String::fromUTF8(absolutePath(*url_))));
+    const auto key = keyOf(*url_);
     isValid_ = key.has_value();
     if (key)
         key_ = *key;

@@ -50,8 +50,10 @@ URLRef resolvingSymbolicLinks(const URL& url)
     FileStatus status;
     if (path.empty() || !resolve(path.c_str(), resolved) || !systemCalls().pathStatus(resolved.c_str(), &status))
         return nullptr;
-    return URL::createWithFileSystemPath(String::fromUTF8(resolved), PathStyle::posix,
-                                         status.kind == FileKind::directory);
+    const bool isDirectory = status.kind == FileKind::directory;
+    return String::fromUTF8(path).isNull()
+               ? URL::createWithFileSystemBytes(resolved, isDirectory)
+               : URL::createWithFileSystemPath(String::fromUTF8(resolved), PathStyle::posix, isDirectory);
 }
 
 String resolvingSymbolicLinksInPath(const String& path)

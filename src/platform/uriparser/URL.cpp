@@ -136,6 +136,12 @@ URLRef URL::createWithFileSystemPath(const String& path, PathStyle style, bool i
     return nullptr;
 }
 
+URLRef URL::createWithFileSystemBytes(std::string_view path, bool isDirectory)
+{
+    const bool isPath = path.starts_with('/') && path.find('\0') == path.npos;
+    return isPath ? create(withSingleSlashes(path), isDirectory, {}) : nullptr;
+}
+
 URLRef URL::createWithString(std::string_view utf8, URLRef base)
 {
     if (String::fromUTF8(utf8).isNull())

@@ -1,13 +1,12 @@
 #include "tool/shared/access/FileAccess.h"
 
 #include "tool/shared/access/Parties.h"
+#include "tool/shared/input/FileLocation.h"
 #include "tool/shared/output/Failure.h"
 
 #include <fmt/core.h>
 
-#include <filesystem>
 #include <functional>
-#include <system_error>
 
 using platform::FileCoordinator;
 
@@ -33,22 +32,9 @@ FileAccess opened(const std::string& path, const platform::CoordinatedItem& item
 
 } // namespace
 
-platform::URLRef coordinatedURL(const std::string& path)
-{
-    std::error_code error;
-    const std::filesystem::path absolute = std::filesystem::absolute(path, error);
-    if (error)
-        throw Failure(systemErrorText(error.value()));
-    const auto text = platform::String::fromFileSystemRepresentation(absolute.c_str());
-    auto url = platform::URL::createWithFileSystemPath(text, platform::PathStyle::posix, false);
-    if (!url)
-        throw OtherKind("its path is not valid UTF-8", OtherKind::Kind::unknown);
-    return url;
-}
-
 FileAccess accessForReading(const std::string& path, const WaitOptions& wait)
 {
-    const platform::CoordinatedItem item(coordinatedURL(path));
+    const platform::CoordinatedItem item(fileLocation(path));
     if (lockAbove(item))
         return nullptr;
     if (FileAccess access = FileCoordinator().tryToOpenForReading(item))
@@ -63,7 +49,7 @@ FileAccess accessForReading(const std::string& path, const WaitOptions& wait)
 
 FileAccess accessForWriting(const std::string& path, FileCoordinator::WritingOptions options, const WaitOptions& wait)
 {
-    const platform::CoordinatedItem item(coordinatedURL(path));
+    const platform::CoordinatedItem item(fileLocation(path));
     if (const auto lock = lockAbove(item)) {
         if (lock->isWriting)
             return nullptr;

@@ -9,9 +9,6 @@
 
 using FileAccess = std::unique_ptr<platform::CoordinatedAccess>;
 
-/// The URL under which a file is coordinated, whether it exists or not; throws Failure for a path that is not UTF-8.
-platform::URLRef coordinatedURL(const std::string& path);
-
 /// For as long as the result lives nobody has write access. Null where the system refuses coordination: the file is
 /// then read without it; and under a `ktfiles lock` of the file, which runs this process. Throws Failure, also when the
 /// time is up.

@@ -3,7 +3,9 @@
 #include "tool/shared/arguments/ChunkId.h"
 #include "tool/shared/arguments/CoordinationFolder.h"
 #include "tool/shared/arguments/Nearest.h"
+#include "tool/shared/input/StandardInput.h"
 #include "tool/shared/output/Failure.h"
+#include "tool/shared/output/ShownName.h"
 #include "tool/shared/output/UnseenCharacters.h"
 
 #include <algorithm>
@@ -18,7 +20,9 @@ namespace {
 
 std::string fileProblem(const std::string& argument)
 {
-    return argument == "-" ? "\"-\" is not a file name; a file of that name is \"./-\"" : "";
+    return argument == kStandardInput
+               ? "\"-\" is standard input, and this needs a file's name; a file called so is \"./-\""
+               : "";
 }
 
 std::string pathProblem(const std::string& argument)
@@ -128,7 +132,14 @@ void CommandLine::addOutputOptions(Verb& verb)
 
 Argument CommandLine::addFile(Verb& verb, std::string& file, const std::string& name)
 {
-    return verb.addText(name, file, "The audio file", fileProblem).label(" ");
+    const auto take = [&file](const std::string& text) { file = nameMeantBy(text); };
+    return verb.addText(name, take, "The audio file", fileProblem).label(" ");
+}
+
+Argument CommandLine::addFileOrInput(Verb& verb, std::string& file)
+{
+    const auto take = [&file](const std::string& text) { file = nameMeantBy(text); };
+    return verb.addText("FILE", take, "The audio file; \"-\" is standard input").label(" ");
 }
 
 Argument CommandLine::addFiles(Verb& verb, std::vector<std::string>& files, const std::string& name)
@@ -139,9 +150,15 @@ Argument CommandLine::addFiles(Verb& verb, std::vector<std::string>& files, cons
 Argument CommandLine::addFiles(Verb& verb, FileArguments& files, const std::string& name)
 {
     files.label = name;
-    const Argument added = addFiles(verb, files.names, name);
+    const Argument added = verb.addTexts(name, files.names, "The audio files, and folders of them");
     addFileList(verb, files);
-    return Argument(added).describe("The audio files, and folders of them");
+    return added;
+}
+
+Argument CommandLine::addFilesOrInput(Verb& verb, FileArguments& files)
+{
+    files.takesInput = true;
+    return addFiles(verb, files).describe("The audio files, and folders of them; \"-\" is standard input");
 }
 
 void CommandLine::addFileList(Verb& verb, FileArguments& files)

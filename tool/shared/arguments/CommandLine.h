@@ -27,9 +27,13 @@ public:
 
     // Arguments that verbs have in common. The values must outlive the parsing.
     static Argument addFile(Verb& verb, std::string& file, const std::string& name = "FILE");
+    /// Also "-", for standard input.
+    static Argument addFileOrInput(Verb& verb, std::string& file);
     static Argument addFiles(Verb& verb, std::vector<std::string>& files, const std::string& name = "FILE");
     /// Also folders, and lists by the options --files-from and -0. That there is a name at all is seen by `allNames`.
     static Argument addFiles(Verb& verb, FileArguments& files, const std::string& name = "FILE");
+    /// Also "-", for standard input.
+    static Argument addFilesOrInput(Verb& verb, FileArguments& files);
     static void addFileList(Verb& verb, FileArguments& files);
     static Argument addChunkId(Verb& verb, FourCC& id);
     /// An option whose value names a file; "-" stands for standard input or output.

@@ -1,5 +1,6 @@
 #include "tool/shared/edits/EditProblems.h"
 
+#include "audiofile/SoundProblem.h"
 #include "platform/SystemCalls.h"
 #include "tool/shared/input/InputFile.h"
 #include "tool/shared/output/Failure.h"
@@ -84,6 +85,13 @@ std::string addStatusText(std::int32_t status)
     }
 }
 
+std::string shortText(FourCC id)
+{
+    std::string text = fourCCText(id);
+    text.erase(text.find_last_not_of(' ') + 1);
+    return text;
+}
+
 std::string textOf(const ContainerProblem& problem)
 {
     using Kind = ContainerProblem::Kind;
@@ -96,6 +104,16 @@ std::string textOf(const ContainerProblem& problem)
         return "is empty";
     case Kind::noContainer:
         return "no container known here (RIFF, RF64, BW64, AIFF, AIFC, REX2, CAF)";
+    case Kind::unknown:
+        return "no audio that can be decoded";
+    case Kind::headerCut:
+        return "ends within its header";
+    case Kind::noFormat:
+        return fmt::format("says nowhere what its samples are (no {} chunk)", shortText(problem.id));
+    case Kind::noSound:
+        return problem.id == 0 ? "no sound" : fmt::format("no sound (no {} chunk)", shortText(problem.id));
+    case Kind::noIndex:
+        return fmt::format("says nowhere where its samples are (no {} box)", shortText(problem.id));
     case Kind::onlyRead:
         return "containers of its kind are only read (RIFX, Wave64)";
     case Kind::chunks:
@@ -181,6 +199,9 @@ void requireNone(const FileProblem& problem)
 
 void requireNone(const ContainerProblem& problem)
 {
+    using Kind = ContainerProblem::Kind;
+    if (problem.kind == Kind::empty || problem.kind == Kind::unknown)
+        throw OtherKind(textOf(problem), OtherKind::Kind::unknown);
     if (problem)
         throw Failure(textOf(problem));
 }
@@ -188,7 +209,10 @@ void requireNone(const ContainerProblem& problem)
 ChunkSurvey surveyChunks(CAudioFileIO& file, FourCC id)
 {
     ChunkSurvey survey;
-    requireNone(SurveyChunks(file, id, survey));
+    const ContainerProblem problem = SurveyChunks(file, id, survey);
+    if (problem.kind == ContainerProblem::Kind::chunks)
+        requireNone(SoundProblem(file)); // says best what is wrong with it
+    requireNone(problem);
     return survey;
 }
 

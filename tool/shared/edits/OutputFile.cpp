@@ -4,6 +4,7 @@
 #include "platform/SystemCalls.h"
 #include "tool/shared/edits/EditProblems.h"
 #include "tool/shared/edits/EndingSignals.h"
+#include "tool/shared/input/StandardInput.h"
 #include "tool/shared/output/Failure.h"
 
 #include <algorithm>
@@ -54,7 +55,7 @@ OutputFile::OutputFile(const std::string& out, const std::string& source, Existi
     const bool exists = ::stat(out.c_str(), &found) == 0;
     if (exists && S_ISDIR(found.st_mode))
         throw Failure(out + " is a folder");
-    if (exists && ::stat(source.c_str(), &original) == 0 && original.st_dev == found.st_dev &&
+    if (exists && ::stat(systemPath(source).c_str(), &original) == 0 && original.st_dev == found.st_dev &&
         original.st_ino == found.st_ino)
         throw Failure("the output would be written over the file itself");
     if (exists && !S_ISREG(found.st_mode)) {

@@ -21,7 +21,7 @@ FileAccess accessFor(const std::string& target, const EditOptions& options)
 
 } // namespace
 
-SafeEdit::SafeEdit(const std::string& path, const EditOptions& options) : options_(options)
+SafeEdit::SafeEdit(const std::string& path, const EditOptions& options) : given_(path), options_(options)
 {
     if (isFolder(path))
         throw Failure("is a folder, and edits take files only");
@@ -32,11 +32,13 @@ SafeEdit::SafeEdit(const std::string& path, const EditOptions& options) : option
         waitForLock(descriptor, file, waiting);
         return kStatusOK;
     };
-    requireNone(edit_.Begin(target, {.inPlace = options.inPlace,
-                                     .keepTimes = options.keepTimes,
-                                     .backup = options.backup,
-                                     .waitForLock = wait,
-                                     .progress = copyProgress("copying", options.quiet)}));
+    FileProblem problem = edit_.Begin(target, {.inPlace = options.inPlace,
+                                               .keepTimes = options.keepTimes,
+                                               .backup = options.backup,
+                                               .waitForLock = wait,
+                                               .progress = copyProgress("copying", options.quiet)});
+    problem.name = asGiven(problem.name, path);
+    requireNone(problem);
 }
 
 std::string SafeEdit::apply(const EditScope& scope, const std::function<void(const std::string& path)>& change)
@@ -47,5 +49,5 @@ std::string SafeEdit::apply(const EditScope& scope, const std::function<void(con
     });
     requireNone(edit_.Difference());
     requireNone(problem);
-    return edit_.Backup();
+    return asGiven(edit_.Backup(), given_);
 }

@@ -34,11 +34,12 @@ public:
 
     /// Calls `change` with a path that leads to the file to change, and to no other whatever happens to its name. What
     /// is not in the scope is compared afterwards. When anything throws, the original is as it was, to the byte; with
-    /// `inPlace` it is as `change` left it, but for what hangs behind its end. Returns the path of the backup, or an
-    /// empty string.
+    /// `inPlace` it is as `change` left it, but for what hangs behind its end. Returns the path of the backup, in the
+    /// words in which the file was named, or an empty string.
     std::string apply(const EditScope& scope, const std::function<void(const std::string& path)>& change);
 
 private:
+    std::string given_;
     EditOptions options_;
     FileAccess access_;
     CContainerEdit edit_;

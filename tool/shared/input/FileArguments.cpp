@@ -3,8 +3,11 @@
 #include "platform/OwnedDescriptor.h"
 #include "tool/shared/arguments/UsageError.h"
 #include "tool/shared/input/FolderWalk.h"
+#include "tool/shared/input/StandardInput.h"
 #include "tool/shared/output/Failure.h"
+#include "tool/shared/output/ShownName.h"
 
+#include <algorithm>
 #include <array>
 #include <cerrno>
 #include <fcntl.h>
@@ -20,8 +23,8 @@ void addName(std::vector<std::string>& names, std::string_view name)
 {
     if (name.size() > kLongestName)
         throw Failure("is no list of files: a name has more than 65536 bytes");
-    if (!name.empty())
-        names.emplace_back(name);
+    if (!name.empty()) // which may be called "-", as a file
+        names.push_back(name == kStandardInput ? "./-" : nameMeantBy(std::string(name)));
 }
 
 void addListed(std::vector<std::string>& names, int descriptor, char separator)
@@ -50,16 +53,29 @@ void addListed(std::vector<std::string>& names, int descriptor, char separator)
 
 } // namespace
 
+void requireNoInput(const std::string& name)
+{
+    if (name == kStandardInput)
+        throw UsageError("\"-\" is standard input, and this needs a file's name; a file called so is \"./-\"");
+}
+
 bool FileArguments::maybeSeveral() const
 {
-    return names.size() != 1 || !list.empty() || isFolder(names.front());
+    return names.size() != 1 || !list.empty() || isFolder(nameMeantBy(names.front()));
 }
 
 std::vector<std::string> allNames(const FileArguments& files)
 {
     if (files.names.empty() && files.list.empty())
         throw MissingArgument(files.label);
-    std::vector<std::string> names = files.names;
+    std::vector<std::string> names;
+    for (const std::string& name : files.names)
+        names.push_back(nameMeantBy(name));
+    if (std::ranges::find(names, kStandardInput) != names.end()) {
+        requireNoInput(files.takesInput ? "" : kStandardInput);
+        if (files.list == kStandardInput)
+            throw UsageError("\"-\" is standard input, which is the list of files already");
+    }
     if (files.list.empty())
         return names;
     const bool fromInput = files.list == "-";

@@ -10,6 +10,7 @@ struct FileArguments {
     bool isNulSeparated = false; // the names in the list; else one stands on a line
 
     std::string label = "FILE"; // what the grammar calls them
+    bool takesInput = false;    // "-" for standard input
     bool takesFolders = true;   // else they are files like any other, which are refused when they are opened
 
     /// What messages about the list call it.
@@ -18,6 +19,10 @@ struct FileArguments {
     bool maybeSeveral() const;
 };
 
+/// Throws UsageError for "-".
+void requireNoInput(const std::string& name);
+
 /// The names on the command line, and then those of the list. Throws MissingArgument when there is neither, and
-/// Failure, which is about the list, for one that cannot be read or names no file.
+/// Failure, which is about the list, for one that cannot be read or names no file. UsageError for "-" where that
+/// is not taken, or is the list already.
 std::vector<std::string> allNames(const FileArguments& files);

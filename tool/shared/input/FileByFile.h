@@ -4,6 +4,7 @@
 #include "tool/shared/input/FileArguments.h"
 #include "tool/shared/input/FoundFile.h"
 #include "tool/shared/output/Output.h"
+#include "tool/shared/output/ShownName.h"
 
 #include <functional>
 #include <memory>
@@ -45,7 +46,7 @@ bool writeFileByFile(Writer& writer, const Files& files, const FileLoop& loop, R
         [&](const FoundFile& file) -> FileRest {
             using Result = std::invoke_result_t<Read&, const FoundFile&>;
             const auto result = std::make_shared<Result>(read(file));
-            return [&writer, path = file.path, result] { writer.add(path, *result); };
+            return [&writer, path = shownName(file.path), result] { writer.add(path, *result); };
         },
         [&](const std::string& path, const std::string& text) { writer.addFailure(path, text); });
     writer.finish();

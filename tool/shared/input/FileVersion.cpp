@@ -1,5 +1,6 @@
 #include "tool/shared/input/FileVersion.h"
 
+#include "tool/shared/input/StandardInput.h"
 #include "tool/shared/output/Failure.h"
 
 #include <cerrno>
@@ -17,7 +18,7 @@ std::int64_t nanoseconds(const timespec& time)
 FileVersion versionOf(const std::string& path)
 {
     struct stat status = {};
-    if (::stat(path.c_str(), &status) != 0)
+    if (::stat(systemPath(path).c_str(), &status) != 0)
         throw Failure(systemErrorText(errno));
     return {status.st_dev, status.st_ino, status.st_size, nanoseconds(status.st_mtim), nanoseconds(status.st_ctim)};
 }

@@ -1,5 +1,6 @@
 #include "tool/shared/input/FolderWalk.h"
 
+#include "tool/shared/input/StandardInput.h"
 #include "tool/shared/output/Failure.h"
 
 #include <algorithm>
@@ -27,7 +28,7 @@ std::string joined(const std::string& folder, const std::string& name)
 bool isFolder(const std::string& path)
 {
     struct stat status = {};
-    return ::stat(path.c_str(), &status) == 0 && S_ISDIR(status.st_mode);
+    return path != kStandardInput && ::stat(path.c_str(), &status) == 0 && S_ISDIR(status.st_mode);
 }
 
 FolderWalk::FolderWalk(std::vector<std::string> roots, Visit visit) : roots_(std::move(roots)), visit_(std::move(visit))
@@ -42,6 +43,8 @@ bool FolderWalk::run()
 {
     return std::all_of(roots_.begin(), roots_.end(), [this](const std::string& root) {
         struct stat status = {};
+        if (root == kStandardInput)
+            return visit_({root, {}});
         if (::stat(root.c_str(), &status) != 0)
             return visit_({root, systemErrorText(errno)});
         if (!S_ISDIR(status.st_mode))

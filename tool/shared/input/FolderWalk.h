@@ -9,7 +9,7 @@
 #include <utility>
 #include <vector>
 
-/// Whether the path leads to a folder.
+/// Whether the path leads to a folder; standard input, "-", is none.
 bool isFolder(const std::string& path);
 
 /// Visits each folder once, in the order of its names' bytes, and holds no more than the names of the folders that it

@@ -1,19 +1,27 @@
 #include "tool/shared/input/InputFile.h"
 
 #include "audiofile/ContainerChanges.h"
+#include "audiofile/SoundProblem.h"
+#include "media/containers/AudioHandle.h"
 #include "platform/core/Status.h"
 #include "tool/shared/edits/EditProblems.h"
+#include "tool/shared/input/CodingWords.h"
+#include "tool/shared/input/FileLocation.h"
 #include "tool/shared/input/FoundFile.h"
+#include "tool/shared/input/StandardInput.h"
 #include "tool/shared/output/Failure.h"
 
+#include <algorithm>
 #include <cerrno>
 #include <filesystem>
 #include <sys/stat.h>
 
+using platform::AudioHandle;
+
 void requireRegularFile(const std::string& path)
 {
     struct stat status = {};
-    if (::stat(path.c_str(), &status) != 0)
+    if (::stat(systemPath(path).c_str(), &status) != 0)
         throw Failure(systemErrorText(errno));
     if (S_ISDIR(status.st_mode))
         throw Failure("is a folder");
@@ -33,41 +41,81 @@ std::string resolvedPath(const std::string& path)
     return resolved.string();
 }
 
+std::string asGiven(const std::string& found, const std::string& given)
+{
+    std::error_code error;
+    const std::filesystem::path path(found), folder = std::filesystem::path(given).parent_path();
+    const std::filesystem::path resolved = std::filesystem::canonical(folder.empty() ? "." : folder, error);
+    return !found.empty() && resolved == path.parent_path() ? (folder / path.filename()).string() : found;
+}
+
 CFileRef referenceTo(const std::string& path)
 {
     requireRegularFile(path);
-    // Absolute, since the library expands a "~" at the start of a path, which the shell has done already.
-    std::error_code error;
-    const std::filesystem::path absolute = std::filesystem::absolute(path, error);
-    if (error)
-        throw Failure(systemErrorText(error.value()));
-    if (platform::String::fromFileSystemRepresentation(absolute.c_str()).isNull())
-        throw OtherKind("its path is not valid UTF-8", OtherKind::Kind::unknown);
-    CFileRef reference(absolute.c_str(), false);
-    if (!reference.IsValid())
-        throw Failure("its path cannot be a file URL");
-    return reference;
+    return CFileRef(fileLocation(path));
 }
+
+namespace {
+
+/// Whether the disk gives the ends of the file, where headers and tables are.
+bool canBeRead(CFileIO& file)
+{
+    constexpr std::int64_t most = 1 << 22;
+    const std::int64_t length = file.GetEOF();
+    const std::int64_t piece = std::min(length, most);
+    Bytes bytes(static_cast<std::size_t>(piece));
+    return file.Read(bytes.data(), 0, static_cast<long>(piece), nullptr) == kStatusOK &&
+           file.Read(bytes.data(), length - piece, static_cast<long>(piece), nullptr) == kStatusOK;
+}
+
+} // namespace
 
 void openAudio(CAudioFileIO& file, const std::string& path)
 {
     requireOK(file.Open(referenceTo(path), 0));
-    if (file.GetEOF() == 0)
-        throw OtherKind("is empty", OtherKind::Kind::unknown);
-    if (file.Info().fileType == 0)
-        throw OtherKind("no audio file known here", OtherKind::Kind::unknown);
+    if (const std::int32_t status = file.InfoStatus(); status == AudioHandle::kFormatNotSupported)
+        requireDecoder(file);
+    else if (status != kStatusOK || file.Info().fileType == 0)
+        failForSound(path, status);
+}
+
+void requireKnown(const std::string& path)
+{
+    if (!isCalledContainer(path) && isCalledAudio(path)) // it mostly is
+        return;
+    CFileIO file;
+    requireOK(file.OpenRead(referenceTo(path), 0));
+    requireNone(SoundProblem(file));
+}
+
+void failForSound(const std::string& path, std::int32_t status)
+{
+    CFileIO file;
+    requireOK(file.OpenRead(referenceTo(path), 0));
+    requireNone(SoundProblem(file));
+    if (status == kStatusEndOfFile)
+        throw Failure("ends within its header");
+    if (status == kStatusIOError && canBeRead(file))
+        throw Failure("its sound cannot be decoded: it is damaged, or cut short");
+    throw Failure(StatusText(status));
 }
 
 void requireDecoder(CAudioFileIO& file)
 {
     platform::Error error;
-    if (const std::int32_t status = file.OpenDecoder(&error); status != kStatusOK)
-        throw Failure(error.code == status ? error.description : StatusText(status));
+    const std::int32_t status = file.OpenDecoder(&error);
+    if (status == AudioHandle::kFormatNotSupported && error.code == status)
+        throw Failure(containerWord(file.Info()) + ": " + error.description);
+    if (status != kStatusOK)
+        failForSound(file.GetPath(), status);
 }
 
 void openContainer(CAudioFileIO& file, const std::string& path, unsigned int mode)
 {
-    requireNone(OpenContainer(file, referenceTo(path), mode));
+    const ContainerProblem problem = OpenContainer(file, referenceTo(path), mode);
+    if (problem.kind == ContainerProblem::Kind::noContainer)
+        requireKnown(path); // says best what is wrong with it
+    requireNone(problem);
 }
 
 void openChunks(CAudioFileIO& file, const std::string& path)

@@ -6,6 +6,7 @@
 #include "tool/shared/arguments/Nearest.h"
 #include "tool/shared/arguments/QuotedText.h"
 #include "tool/shared/arguments/UsageError.h"
+#include "tool/shared/output/ShownName.h"
 #include "tool/shared/output/Terminal.h"
 
 #include <fmt/format.h>
@@ -303,7 +304,8 @@ TagArguments parseKeys(std::span<const std::string> arguments)
         const auto fields = fieldsForKey(argument);
         struct stat status = {};
         // A misspelt key must not pass for a missing file: without keys all tags of the other files would go.
-        if (fields.empty() && argument.find('/') == std::string::npos && ::lstat(argument.c_str(), &status) != 0)
+        if (fields.empty() && argument.find('/') == std::string::npos &&
+            ::lstat(nameMeantBy(argument).c_str(), &status) != 0)
             refuse(fmt::format("\"{}\" is neither a file nor a tag{}; tags are {}", printable(argument),
                                suggestion(argument), knownKeys()));
         if (fields.empty())

@@ -4,6 +4,7 @@
 #include "tool/shared/looptags/LoopTagFields.h"
 #include "tool/shared/output/Failure.h"
 #include "tool/shared/output/JsonRecords.h"
+#include "tool/shared/output/ShownName.h"
 #include "tool/shared/output/Terminal.h"
 
 #include <algorithm>
@@ -151,7 +152,7 @@ void editFile(const std::string& path, const TagsEditor& editor, const EditOptio
     std::string backup;
     if (!options.dryRun && !plan.changes.empty())
         backup = edit.apply(EditScope::ofLoopTags(), [&](const std::string& copy) { writeTags(copy, plan); });
-    report.add(path, plan, backup);
+    report.add(shownName(path), plan, shownName(backup));
 }
 
 } // namespace

@@ -2,6 +2,7 @@
 #include "audiofile/CAudioFileIO.h"
 #include "loops/VireoLoopUserDataUtils.h"
 #include "media/containers/ContainerHeaders.h"
+#include "tool/shared/input/FileLocation.h"
 #include "tool/shared/input/InputFile.h"
 #include "tool/shared/looptags/LoopTagFields.h"
 #include "tool/shared/looptags/LoopTags.h"
@@ -9,7 +10,6 @@
 #include <fmt/format.h>
 
 #include <algorithm>
-#include <filesystem>
 
 using platform::AudioFile;
 
@@ -72,22 +72,14 @@ std::vector<LoopTags::Chunk> carriedChunks(AudioFile& file, FourCC fileType)
     return found;
 }
 
-platform::URLRef urlOf(const std::string& path)
-{
-    std::error_code error;
-    const std::string absolute = path.starts_with('/') ? path : std::filesystem::absolute(path, error).string();
-    const platform::String location = platform::String::fromFileSystemRepresentation(absolute.c_str());
-    if (location.isNull())
-        throw Failure("its path is not valid UTF-8");
-    return platform::URL::createWithFileSystemPath(location, platform::PathStyle::posix, false);
-}
-
 void requireOpen(std::int32_t status, const std::string& path)
 {
     if (status != kStatusOK)
         requireRegularFile(path); // says best what is wrong with it
-    if (status == kStatusParameterError)
+    if (status == kStatusParameterError) {
+        requireKnown(path);
         throw OtherKind("is no WAVE, AIFF or CAF file", OtherKind::Kind::unknown);
+    }
     requireOK(status);
 }
 
@@ -144,7 +136,7 @@ std::string sourceName(FourCC id)
 LoopTags readTags(const std::string& path, bool withSamplers)
 {
     std::int32_t status = kStatusOK;
-    auto opened = AudioFile::openToRead(*urlOf(path), &status);
+    auto opened = AudioFile::openToRead(*fileLocation(path), &status);
     requireOpen(status, path);
     VireoLoopChunksManager manager(std::move(opened));
     AudioFile& file = *manager.audioFile();
@@ -170,7 +162,7 @@ LoopTags readTags(const std::string& path, bool withSamplers)
 
 VireoLoopChunksManager openLoopFile(const std::string& path, AudioFile::Permission permission)
 {
-    VireoLoopChunksManager manager(urlOf(path), permission);
+    VireoLoopChunksManager manager(fileLocation(path), permission);
     requireOpen(manager.status(), path);
     const FourCC type = manager.audioFileTypeID();
     if (type != kAIFF && type != kCaff)

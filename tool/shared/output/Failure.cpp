@@ -1,6 +1,7 @@
 #include "tool/shared/output/Failure.h"
 
 #include "platform/core/Status.h"
+#include "tool/shared/output/ShownName.h"
 #include "tool/shared/output/UnseenCharacters.h"
 
 #include <fmt/core.h>
@@ -12,7 +13,7 @@
 std::string systemErrorText(int error)
 {
     const std::int32_t status = PosixErrorToOSErr(error);
-    return status == kStatusIOError && error != EIO ? std::strerror(error) : StatusText(status);
+    return (status == kStatusIOError && error != EIO) || error == ELOOP ? std::strerror(error) : StatusText(status);
 }
 
 void requireOK(std::int32_t status)
@@ -24,5 +25,7 @@ void requireOK(std::int32_t status)
 void reportFailure(const std::string& path, const std::string& text)
 {
     // Not by fmt::print, which throws where standard error cannot be written: the work is not to end for that.
-    std::fputs(fmt::format("ktfiles: {}: {}\n", printableOnError(path), printableOnError(text)).c_str(), stderr);
+    std::fputs(
+        fmt::format("ktfiles: {}: {}\n", printableOnError(shownName(path)), printableOnError(shownName(text))).c_str(),
+        stderr);
 }

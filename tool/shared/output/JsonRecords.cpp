@@ -1,5 +1,7 @@
 #include "tool/shared/output/JsonRecords.h"
 
+#include "tool/shared/output/ShownName.h"
+
 #include <utility>
 
 JsonRecords::JsonRecords(const OutputOptions& options) : shape_(options.json)
@@ -28,7 +30,7 @@ void JsonRecords::addFailure(const std::string& path, const std::string& text)
 {
     if (shape_ == JsonShape::none)
         return;
-    begin().beginObject().member("path", path).member("error", text).endObject();
+    begin().beginObject().member("path", shownName(path)).member("error", shownName(text)).endObject();
     end();
 }
 

@@ -132,6 +132,8 @@ class Metadata(CommandTest):
         self.write("a.wav", wave(chunk(b"iXML", b"<TRACK/><SYNC_POINT_LOW>5</SYNC_POINT_LOW><TRACK>"), frames=9600))
         told = self.decode("--start", "1", "--channels", "2")
         self.assertEqual(told["notKept"], ["iXML still has times of the whole file at its own rate", "iXML still has the tracks of the file"])
+        self.write("a.wav", wave(info(INAM="a"), chunk(b"LIST", b"INFOxxxx", size=99), frames=9600))
+        self.assertEqual(self.record("decode", "a.wav", "-o", "out.wav", "--force")["notKept"], ["LIST is not carried over"])
         self.write("a.wav", wave(chunk(b"axml", b'<a sampleRate="48000"/>'), frames=9600))
         self.assertEqual(self.decode("--bits", "32")["notKept"], ["axml still has the sample rates and bit depths of the file"])
 

@@ -24,7 +24,7 @@ constexpr std::array kOfWAVE{kBext, kIXML, kAxml, kChna, kCue, kList, kDigest};
 constexpr std::array kOfAIFF{kMark, kComments, fourCC("NAME"), fourCC("AUTH"), fourCC("(c) "), kRemark};
 constexpr std::array kOfCAF{kCAFInfo, kCAFMarkers, kCAFTexts};
 constexpr std::array<std::string_view, 7> kOfTexts{"INFO", "info", "NAME", "AUTH", "(c)", "ANNO", "COMT"};
-/// More than people write; it is held in memory.
+/// More than people write; all of them are held in memory.
 constexpr std::int64_t kMostBytes = 256 << 20;
 
 FourCC formOf(const HeldChunk& chunk)
@@ -68,28 +68,55 @@ DecodeMetadata::DecodeMetadata(const std::string& path)
     isFloat_ = file.Info().floatingPoint;
     isLinearPCM_ = file.Info().IsLinearPCM();
     ContainerExtent extent;
-    std::span<const FourCC> ids;
+    std::int64_t room = kMostBytes;
     const auto visit = [&](const ChunkEntry& chunk) {
-        const ContainerKind kind = extent.kind;
-        family_ = kind == ContainerKind::iff    ? Family::aiff
-                  : kind == ContainerKind::caf  ? Family::caf
-                  : kind == ContainerKind::rex2 ? Family::none
-                                                : Family::wave;
-        order_ = kind == ContainerKind::rifx ? std::endian::big : std::endian::little;
-        ids = family_ == Family::wave   ? std::span<const FourCC>(kOfWAVE)
-              : family_ == Family::aiff ? std::span<const FourCC>(kOfAIFF)
-              : family_ == Family::caf  ? std::span<const FourCC>(kOfCAF)
-                                        : std::span<const FourCC>();
-        const bool isThere = chunk.size >= 0 && chunk.size <= std::min(extent.fileLength - chunk.body, kMostBytes);
-        if (!isThere || std::ranges::find(ids, chunk.id) == ids.end())
+        family_ = familyOf(extent.kind);
+        order_ = extent.kind == ContainerKind::rifx ? std::endian::big : std::endian::little;
+        const auto ids = chunksOf(family_);
+        if (std::ranges::find(ids, chunk.id) == ids.end())
             return true;
-        HeldChunk held{chunk.id, Bytes(static_cast<std::size_t>(chunk.size))};
-        if (held.body.empty() ||
-            file.Read(held.body.data(), chunk.body, static_cast<long>(chunk.size), nullptr) == kStatusOK)
+        const bool isThere = chunk.size >= 0 && chunk.size <= std::min(extent.fileLength - chunk.body, room);
+        HeldChunk held{chunk.id, Bytes(static_cast<std::size_t>(isThere ? chunk.size : 0))};
+        const auto size = std::ssize(held.body);
+        if (isThere && (size == 0 || file.Read(held.body.data(), chunk.body, size, nullptr) == kStatusOK)) {
+            room -= size;
             chunks_.push_back(std::move(held));
+        } else {
+            lost_.push_back(chunk.id);
+        }
         return true;
     };
     file.ForEachChunk(visit, &extent);
+}
+
+DecodeMetadata::Family DecodeMetadata::familyOf(ContainerKind kind)
+{
+    switch (kind) {
+    case ContainerKind::riff:
+    case ContainerKind::rifx:
+    case ContainerKind::wave64:
+        return Family::wave;
+    case ContainerKind::iff:
+        return Family::aiff;
+    case ContainerKind::caf:
+        return Family::caf;
+    default:
+        return Family::none;
+    }
+}
+
+std::span<const FourCC> DecodeMetadata::chunksOf(Family family)
+{
+    switch (family) {
+    case Family::wave:
+        return kOfWAVE;
+    case Family::aiff:
+        return kOfAIFF;
+    case Family::caf:
+        return kOfCAF;
+    default:
+        return {};
+    }
 }
 
 /// One output in the making.
@@ -321,6 +348,8 @@ private:
         for (const HeldChunk& chunk : chunks_)
             write(out, chunk, fileType_);
         kept_.chunks = out.take();
+        std::erase_if(kept_.sourceIds,
+                      [this](FourCC id) { return std::ranges::find(source_.lost_, id) != source_.lost_.end(); });
         return std::move(kept_);
     }
 

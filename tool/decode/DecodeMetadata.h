@@ -2,9 +2,11 @@
 // ADM.
 #pragma once
 
+#include "media/containers/ContainerTraits.h"
 #include "tool/decode/BroadcastMetadata.h"
 #include "tool/decode/PortableTexts.h"
 
+#include <span>
 #include <string>
 #include <vector>
 
@@ -29,9 +31,13 @@ private:
     enum class Family { none, wave, aiff, caf };
     class Keeper;
 
+    static Family familyOf(platform::ContainerKind kind);
+    static std::span<const FourCC> chunksOf(Family family); // that are looked at
+
     Family family_ = Family::none;
     std::endian order_ = std::endian::little;
     std::vector<HeldChunk> chunks_;
+    std::vector<FourCC> lost_;    // of those that are not all there, or too long
     int bits_ = 0, channels_ = 0; // of the source
     bool isFloat_ = false, isLinearPCM_ = false;
 };

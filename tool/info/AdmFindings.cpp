@@ -1,9 +1,12 @@
 #include "tool/info/AdmFindings.h"
 
+#include "media/containers/ContainerCheck.h"
 #include "tool/shared/adm/AdmTracks.h"
 #include "tool/shared/output/Failure.h"
 
 #include <fmt/format.h>
+
+#include <algorithm>
 
 namespace {
 
@@ -43,7 +46,9 @@ std::vector<AdmFinding> admFindings(const std::string& path, const AdmChunks& ch
                  "renderers refuse the file, or take it for one without ADM"});
     }
     const ChunkEntry& place = chunks.tracks ? *chunks.tracks : *chunks.document;
-    for (const ADMDiagnostic& problem : trackProblems(source, document.get()))
+    std::vector<ADMDiagnostic> problems = trackProblems(source, document.get());
+    problems.resize(std::min(problems.size(), platform::kMostFindings));
+    for (const ADMDiagnostic& problem : problems)
         findings.push_back({"tracksDiffer", place.id, place.offset, "is off: " + problem.text,
                             "renderers leave tracks out, or refuse the file"});
     return findings;

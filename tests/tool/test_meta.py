@@ -8,7 +8,7 @@ import struct
 import subprocess
 import unittest
 
-from command import KTFILES, CommandTest, caf, chunk, wave
+from command import KTFILES, LIBRARY, CommandTest, caf, chunk, wave
 import schemas
 
 UMID = bytes.fromhex("060a2b340101010501010d2013aabbcc") + bytes(range(1, 17))
@@ -138,6 +138,17 @@ class Meta(CommandTest):
             "aesd": "00" * 24, "appl.signature": "stoc", "appl.data": b"data".hex(), "midi": "f07ef7"})
         words = {item["field"]: item.get("words") for item in self.record("meta", "a.aiff")["fields"]}
         self.assertEqual(words["comt[0].timeStamp"], "2024-01-01T00:00:00Z")
+
+    def test_id3_in_chunks(self):
+        self.encoded("a.aiff", "-write_id3v2", "1", "-metadata", "title=Ein Täst", "-metadata", "artist=me")
+        items = {item["field"]: item for item in self.record("meta", "a.aiff", "--only", "id3")["fields"]}
+        if (LIBRARY.parent / "ktfiles/libktfiles-tags.so").exists():
+            self.assertEqual((items["id3.TIT2"]["value"], items["id3.TPE1"]["value"], items["id3.TPE1"]["words"]), ("Ein Täst", "me", "ARTIST"))
+            self.assertEqual(items["id3.TIT2"]["chunk"], "ID3 ")
+        bare, = json.loads(self.run_command("meta", "--json", "a.aiff", "--only", "id3", env=self.without_decoders()).stdout)
+        item, = bare["fields"]
+        self.assertEqual((item["ascii"][:3], item["chunk"]), ("ID3", "ID3 "))
+        self.assertIn("install libktfiles-taglib", item["words"])
 
     def test_caf(self):
         marker = struct.pack(">4sdI4bII", b"rbeg", 44100.5, 7, 1, 2, 3, 4, 5, 2)

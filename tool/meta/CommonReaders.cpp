@@ -28,7 +28,11 @@ bool readID3(const MetaChunk& chunk, const MetaSource&, MetaFields& fields)
 {
     std::vector<platform::EmbeddedTag> tags;
     platform::Error error;
-    if (platform::readID3Chunk(chunk.body, tags, &error) != kStatusOK || tags.empty())
+    if (platform::readID3Chunk(chunk.body, tags, &error) != kStatusOK) {
+        fields.preview("", chunk.body, chunk.body.size(), error.description);
+        return true;
+    }
+    if (tags.empty())
         return false;
     for (const platform::EmbeddedTag& tag : tags) {
         for (const std::string& value : tag.values)

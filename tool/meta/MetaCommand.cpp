@@ -5,6 +5,7 @@
 #include "tool/shared/arguments/ThreadsOption.h"
 #include "tool/shared/input/FileByFile.h"
 #include "tool/shared/output/ClockTime.h"
+#include "tool/shared/output/DisplayWidth.h"
 #include "tool/shared/output/JsonRecords.h"
 
 #include <algorithm>
@@ -124,7 +125,7 @@ private:
     /// A heading for each chunk, its fields below it, their values in one column.
     void addTree(const std::string& path, const FileMetadata& metadata)
     {
-        constexpr std::size_t widest = 40;
+        constexpr int widest = 40;
         output_.print("{}{}{}{}  {}\n", isFirst_ ? "" : "\n", bold(), printable(path), plain(),
                       fourCCText(metadata.container));
         isFirst_ = false;
@@ -135,11 +136,13 @@ private:
                 width_ = 0;
                 for (const MetaField& other : metadata.fields)
                     if (other.place == field.place && other.offset == field.offset)
-                        width_ = std::max(width_, std::min(label(other).size(), widest));
+                        width_ = std::max(width_, std::min(displayWidth(label(other)), widest));
                 output_.print("  {}{}{}  \"{}\" at {}\n", bold(), printable(field.place), plain(),
                               fourCCText(field.chunk), field.offset);
             }
-            output_.print("    {:<{}}{}{}{}\n", label(field), width_, width_ == 0 ? "" : "  ", readable(field),
+            const std::string text = label(field);
+            const int room = std::max(width_ - displayWidth(text), 0);
+            output_.print("    {}{:{}}{}{}{}\n", text, "", room, width_ == 0 ? "" : "  ", readable(field),
                           field.isLatin1 ? " [Latin-1]" : "");
             above = &field;
         }
@@ -163,7 +166,7 @@ private:
     bool color_;
     bool several_;
     bool isFirst_ = true;
-    std::size_t width_ = 0;
+    int width_ = 0;
     Output& output_ = Output::standard();
     JsonRecords json_;
 };
@@ -214,7 +217,7 @@ void declareMeta(CommandLine& commandLine)
                                              wanted.only = groupsFromText(only);
                                          return runMeta(files, wanted, commandLine.output());
                                      });
-    CommandLine::addFiles(verb, files);
+    CommandLine::addFilesOrInput(verb, files);
     addThreads(verb, wanted.threads);
     verb.addFlag("--csv", wanted.isCSV, "Print comma-separated values (RFC 4180), with a header");
     verb.addText("--only", only, "Only these, behind commas: bext, ixml, info, cue, smpl, … or ids of chunks")

@@ -1,5 +1,7 @@
 #include "tool/meta/MetaFields.h"
 
+#include "tool/shared/output/DisplayWidth.h"
+
 #include <fmt/format.h>
 
 #include <algorithm>
@@ -9,35 +11,13 @@ namespace {
 
 constexpr std::size_t kPreviewSize = 32;
 
-/// The length of the UTF-8 character at the front, 0 where there is none: no overlong forms, surrogates, or more than
-/// U+10FFFF.
-std::size_t characterLength(std::string_view text)
-{
-    const auto byte = [&](std::size_t i) { return static_cast<unsigned char>(text[i]); };
-    const unsigned char first = byte(0);
-    const std::size_t length = first < 0x80   ? 1
-                               : first < 0xC2 ? 0
-                               : first < 0xE0 ? 2
-                               : first < 0xF0 ? 3
-                               : first < 0xF5 ? 4
-                                              : 0;
-    if (length == 0 || length > text.size())
-        return 0;
-    for (std::size_t i = 1; i < length; ++i)
-        if (byte(i) < 0x80 || byte(i) > 0xBF)
-            return 0;
-    const bool isWrong = (first == 0xE0 && byte(1) < 0xA0) || (first == 0xED && byte(1) > 0x9F) ||
-                         (first == 0xF0 && byte(1) < 0x90) || (first == 0xF4 && byte(1) > 0x8F);
-    return isWrong ? 0 : length;
-}
-
 bool isUTF8(std::string_view text)
 {
+    constexpr char32_t replacement = 0xFFFD; // which may be there itself, in three bytes
     while (!text.empty()) {
-        const std::size_t length = characterLength(text);
-        if (length == 0)
+        const std::size_t before = text.size();
+        if (takeCharacter(text) == replacement && before - text.size() == 1)
             return false;
-        text.remove_prefix(length);
     }
     return true;
 }

@@ -215,6 +215,10 @@ class Names(CommandTest):
         self.assertEqual([item["path"] for item in self.json("scan", ".")], ["./\\xC4/l\\xF6p.aiff"])
         self.assertEqual(self.record("tags", "\\xC4/l\\xF6p.aiff")["genre"], "Jazz")
 
+    def test_pictures_name_them(self):
+        self.run_command("overview", ".", "--sheet", "out.svg")
+        self.assertEqual([name in (self.folder / "out.svg").read_text() for name in self.shown], [True, True])
+
     def test_edits(self):
         before = self.content(self.names[0])
         report = self.record("chunks", "add", self.shown[0], "note", "--backup", stdin=b"text")

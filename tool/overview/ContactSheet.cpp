@@ -6,6 +6,7 @@
 #include "tool/overview/SVGPicture.h"
 #include "tool/shared/output/DisplayWidth.h"
 #include "tool/shared/output/Failure.h"
+#include "tool/shared/output/ShownName.h"
 #include "tool/shared/output/Terminal.h"
 
 #include <fmt/format.h>
@@ -72,7 +73,8 @@ void layOutTexts(const SheetCell& cell, const PictureSettings& settings, const P
     const bool hasDuration = duration > 0 && duration < width / 2;
     if (hasDuration)
         put(cell.duration, kInset + width, baseline, Anchor::end);
-    if (const std::string name = fitted(printable(cell.name), hasDuration ? width - duration - kLabelGap : width);
+    if (const std::string name =
+            fitted(printable(shownName(cell.name)), hasDuration ? width - duration - kLabelGap : width);
         !name.empty())
         put(name, kInset, baseline, Anchor::start);
     if (cell.picture)
@@ -187,7 +189,7 @@ void ContactSheet::writeSVG(const PictureColors& colors, const Sink& sink) const
         // An element of its own cuts off what another font makes too wide.
         std::string svg = fmt::format("<svg x=\"{}\" y=\"{}\" width=\"{}\" height=\"{}\">\n<title>{}</title>\n",
                                       i % next * cellWidth() + kGap, i / next * cellHeight() + kGap, settings_.width,
-                                      settings_.height + kNameStrip, svgEscaped(cell.name));
+                                      settings_.height + kNameStrip, svgEscaped(shownName(cell.name)));
         if (cell.picture)
             svg += svgParts(*cell.picture, colors);
         std::string texts;

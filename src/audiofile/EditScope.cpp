@@ -8,6 +8,6 @@ EditScope EditScope::ofLoopTags()
     return {Kind::chunks,
             {kBasicTagging, kCategories, kTransients, kChannelStrip0, kChannelStrip1, kChannelStrip2, kPatch,
              kGenerativeInstrument, kEventSequence, kAdditionalLoopData, kStepSequencer, kMIDIFile, kCAFMIDIChunk,
-             fourCC("NAME"), fourCC("AUTH"), fourCC("(c) "), fourCC("COMT"), fourCC("info")},
+             fourCC("NAME"), fourCC("AUTH"), fourCC("(c) "), fourCC("COMT"), fourCC("info"), fourCC("acid"), fourCC("smpl")},
             true};
 }

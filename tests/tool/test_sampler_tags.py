@@ -5,7 +5,7 @@ import struct
 import subprocess
 import unittest
 
-from command import CommandTest, chunk
+from command import CommandTest, caf, chunk
 
 FRAMES = 44100
 
@@ -127,7 +127,76 @@ class SamplerTags(CommandTest):
         self.write("lib/bad.wav", b"no sound")
         result = self.run_command("scan", "lib", status=1)
         self.assertEqual(result.stdout, b"lib/i.aifc\tAIFC\t\t\tA\t\t\t\t\t\n")
-        self.assertIn(b"lib/bad.wav: is no WAVE", result.stderr)
+        self.assertIn(b"lib/bad.wav: no audio", result.stderr)
+
+    KEYS = ("tempo", "beatCount", "midiRootNote", "signature", "loopFileType")
+
+    def of_loop(self, name):
+        shown = self.record("tags", name)
+        return [shown.get(key) for key in self.KEYS]
+
+    def chunk(self, name, chunk_id):
+        return self.run_command("chunks", "get", name, chunk_id).stdout
+
+    def test_copies_there_and_back(self):
+        self.write("a.aiff", aifx())
+        self.write("b.caf", caf(samples=bytes(2 * FRAMES)))
+        self.write("c.wav", loop_wave())
+        self.run_command("tags", "set", "a.aiff", "key=A minor", "beats=4", "signature=3/4", "genre=Rock", "transients=5")
+        copied = self.run_command("tags", "copy", "a.aiff", "c.wav").stdout.decode()
+        self.assertIn('keyType, genre, transients are not kept: "acid" and "smpl"', copied)
+        self.assertEqual(self.of_loop("c.wav"), self.of_loop("a.aiff"))
+        self.assertIn("Root note : 0x39", subprocess.run(["sndfile-info", "c.wav"], cwd=self.folder, capture_output=True).stdout.decode())
+        other, = json.loads(subprocess.run(["exiftool", "-j", "-n", "c.wav"], cwd=self.folder, capture_output=True, check=True).stdout)
+        self.assertEqual([other[key] for key in ("Beats", "RootNote", "Tempo", "MIDIUnityNote", "NumSampleLoops")], [4, 57, 240, 57, 1])
+        self.assertEqual(self.lines("tags", "copy", "a.aiff", "c.wav")[0].split(";")[0], "c.wav: unchanged")
+        self.run_command("tags", "copy", "c.wav", "b.caf")
+        self.run_command("tags", "remove", "a.aiff")
+        self.run_command("tags", "copy", "b.caf", "a.aiff")
+        self.assertEqual(self.of_loop("a.aiff"), self.of_loop("c.wav"))
+        self.assertEqual(self.of_loop("b.caf")[1:4], self.of_loop("c.wav")[1:4])
+        # Roots of other octaves are keys; what follows from beats and length is told where it was stated otherwise.
+        self.write("d.wav", loop_wave((b"acid", acid(tempo=100)), *ALL[1:]))
+        self.write("e.wav", loop_wave((b"smpl", smpl(74)), (b"LIST", b"INFO" + chunk(b"INAM", b"Flute\0"))))
+        told = self.run_command("tags", "copy", "d.wav", "a.aiff").stdout.decode()
+        self.assertIn("the tempo 100 is not kept: beats and length make 480; loop points are not kept; markers are not kept", told)
+        self.assertIn("the root note 74 is kept as the key D, 50", self.run_command("tags", "copy", "e.wav", "a.aiff").stdout.decode())
+        self.assertEqual((self.record("tags", "a.aiff")["key"], self.record("tags", "a.aiff")["title"]), ("D", "Flute"))
+
+    def test_fields_that_are_not_named_stay_in_acid_and_smpl(self):
+        self.write("a.aiff", aifx())
+        self.run_command("tags", "set", "a.aiff", "key=C#")
+        sampler, cue = smpl(62, [(1, 7, 99, 5, 3)], b"maker's own") + b"behind", cues(1, 2)
+        self.write("b.wav", loop_wave((b"acid", acid(flags=0x1C) + b"more"), (b"cue ", cue), (b"smpl", sampler)))
+        before = self.record("info", "b.wav", "--md5")
+        self.run_command("tags", "copy", "a.aiff", "b.wav")
+        self.assertEqual(self.chunk("b.wav", "acid"), acid(flags=0x1E, root=49) + b"more")
+        self.assertEqual(self.chunk("b.wav", "smpl"), smpl(49, [(1, 7, 99, 5, 3)], b"maker's own") + b"behind")
+        self.assertEqual(self.chunk("b.wav", "cue "), cue)
+        self.assertEqual(self.record("info", "b.wav", "--md5")["md5"], before["md5"])
+        for broken in ((b"acid", b"short"), (b"smpl", b"short")):
+            content = self.write("c.wav", loop_wave((b"acid", acid()), broken) if broken[0] == b"smpl" else loop_wave(broken)).read_bytes()
+            self.assertIn("is cut short", self.failure("tags", "copy", "a.aiff" if broken[0] == b"smpl" else "b.wav", "c.wav"))
+            self.assertEqual((self.folder / "c.wav").read_bytes(), content)
+
+    def test_decode_carries_them(self):
+        self.write("a.aiff", aifx())
+        self.run_command("tags", "set", "a.aiff", "key=A", "beats=4", "signature=3/4", "title=Ten")
+        self.run_command("decode", "a.aiff", "-o", "b.wav", "--rate", "22050")
+        self.assertEqual(self.of_loop("b.wav"), self.of_loop("a.aiff"))
+        shown = self.record("tags", "b.wav")
+        self.assertEqual((shown["loops"][0]["lastFrame"], shown["title"]), (22049, "Ten"))
+        self.run_command("decode", "b.wav", "-o", "c.caf")
+        self.assertEqual(self.of_loop("c.caf"), self.of_loop("a.aiff"))
+        # The root note of an instrument's sample makes no loop of it.
+        self.write("d.wav", loop_wave((b"smpl", smpl(62, [(0, 100, 199, 0, 0)])), ALL[-1]))
+        self.run_command("decode", "d.wav", "-o", "d.aiff")
+        self.assertEqual(self.of_loop("d.aiff"), [None] * 5)
+        self.run_command("decode", "d.wav", "-o", "e.wav", "--rate", "22050")
+        shown = self.record("tags", "e.wav")
+        self.assertEqual((shown["midiRootNote"], [(loop["firstFrame"], loop["lastFrame"]) for loop in shown["loops"]]), (62, [(50, 99)]))
+        self.run_command("decode", "a.aiff", "-o", "part.wav", "--end", "100")
+        self.assertEqual(self.of_loop("part.wav"), [None] * 5)
 
 
 if __name__ == "__main__":

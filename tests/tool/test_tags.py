@@ -105,7 +105,7 @@ class Show(TagsTest):
         for name, verbs, said in (("tone-16.wav", editing, "is a WAVE file; tags are set and removed in AIFF and CAF files only"),
                                   ("tone-fl32.aifc", editing, "is an AIFC file; tags are set"),
                                   ("tone-fl32.aifc", (["tags", "copy", "a.aiff"],), "is an AIFC file; loop tags are put into"),
-                                  ("README.md", (["tags"], *editing), "no audio that can be decoded"), ("missing", (["tags"], *editing), "not found")):
+                                  ("README.md", (["tags"], *editing, ["tags", "copy", "a.aiff"]), "no audio that can be decoded"), ("missing", (["tags"], *editing), "not found")):
             before = (self.folder / name).read_bytes() if name[0] in "tR" else None
             for verb in verbs:
                 self.assertIn(said, self.failure(*verb, "./" + name))

@@ -7,6 +7,7 @@
 #include "media/containers/ContainerTraits.h"
 #include "tool/shared/input/InputFile.h"
 #include "tool/shared/looptags/LoopTagFields.h"
+#include "tool/shared/looptags/WaveLoopTags.h"
 
 #include <fmt/format.h>
 
@@ -101,6 +102,24 @@ std::string inWords(const std::vector<std::string>& chunks)
     return fmt::format("{} {} not carried over", text, chunks.size() == 1 ? "is" : "are");
 }
 
+// Texts and markers go another way, from whatever holds them.
+void leaveTexts(LoopSource& source)
+{
+    source.tags.info.clear();
+    source.bytes.texts.clear();
+    source.tags.sampler.markers.clear();
+    std::erase(source.notKept, kMarkersAreLost);
+    if (!source.tags.isLoop()) { // a genre alone makes no loop
+        source.tags.combined.erase(VireoLoopCombinedTagsChunkDataGenreKey);
+        source.bytes.categories.reset();
+    }
+}
+
+bool isWave(const std::string& container)
+{
+    return container == "WAVE" || container == "RF64";
+}
+
 } // namespace
 
 DecodeTags::DecodeTags(const std::string& path)
@@ -112,6 +131,11 @@ DecodeTags::DecodeTags(const std::string& path)
         holdsTags = false;
     } catch (const Failure& failure) { // no reason to go without the sound
         problem_ = failure.what();
+    }
+    if (source_ && source_->tags.fileType != source_->bytes.fileType) { // the chunks of samplers
+        leaveTexts(*source_);
+        others_ = otherChunks(path, false);
+        return;
     }
     others_ = otherChunks(path, holdsTags);
     if (source_ && hasOtherUUIDs(path))
@@ -133,26 +157,32 @@ void DecodeTags::forget(std::span<const FourCC> ids)
 
 void DecodeTags::forgetTexts()
 {
-    if (source_ && !source_->tags.isLoop())
+    const bool mayHoldTexts = source_ && source_->tags.fileType == source_->bytes.fileType;
+    if (mayHoldTexts && !source_->tags.isLoop())
         source_.reset();
 }
 
 bool DecodeTags::carriesTexts(const std::string& container, bool isWhole) const
 {
-    return problem_.empty() && source_ != nullptr && isWhole && (container == "AIFF" || container == "CAF");
+    return problem_.empty() && source_ != nullptr && !source_->tags.info.empty() && isWhole &&
+           (container == "AIFF" || container == "CAF");
 }
 
 CarriedTags DecodeTags::carryTo(const std::string& output, const std::string& container, const DecodedSound& sound,
                                 double sourceRate, bool isWhole)
 {
     CarriedTags carried;
-    const bool canHold = container == "AIFF" || container == "CAF";
+    leaveWhatMakesNoLoop(container);
+    const bool canHold = container == "AIFF" || container == "CAF" || isWave(container);
     const std::string obstacle = !problem_.empty()    ? "they " + problem_
                                  : source_ == nullptr ? ""
                                  : !canHold ? fmt::format("{} holds none", container == "raw" ? "raw sound" : container)
                                  : output.empty() ? "they are put into files only"
                                  : !isWhole       ? "they are true of the whole file only"
                                                   : "";
+    if (obstacle.empty() && source_ != nullptr)
+        for (const char* id : {"acid", "smpl", "INST"})
+            std::erase(others_, id);
     if (!obstacle.empty())
         carried.notKept.push_back("its tags are not carried over: " + obstacle);
     if (!others_.empty())
@@ -174,8 +204,25 @@ CarriedTags DecodeTags::carryTo(const std::string& output, const std::string& co
     return carried;
 }
 
+// AIFF and CAF files hold tags of loops: the root note of a sampler alone would make one of any sound.
+void DecodeTags::leaveWhatMakesNoLoop(const std::string& container)
+{
+    const bool isOfSamplers = source_ && source_->tags.fileType != source_->bytes.fileType;
+    const bool isOfUse = !isOfSamplers || source_->tags.isLoop() ||
+                         (isWave(container) && (!source_->tags.isEmpty() || !source_->tags.sampler.loops.empty()));
+    if (!isOfUse)
+        source_.reset();
+}
+
 void DecodeTags::scaleTransients(double factor)
 {
+    const auto scaled = [factor](std::uint64_t frame) {
+        return static_cast<std::uint64_t>(std::round(static_cast<double>(frame) * factor));
+    };
+    for (SamplerTags::Loop& loop : source_->tags.sampler.loops) {
+        loop.firstFrame = scaled(loop.firstFrame);
+        loop.lastFrame = std::max<std::uint64_t>(scaled(loop.lastFrame + 1), 1) - 1;
+    }
     for (VireoLoopTransient& transient : source_->tags.transients)
         transient.setFrame(
             static_cast<std::uint64_t>(std::min(std::round(static_cast<double>(transient.frame()) * factor), 9e18)));

@@ -34,6 +34,7 @@ public:
                         double sourceRate, bool isWhole);
 
 private:
+    void leaveWhatMakesNoLoop(const std::string& container);
     void scaleTransients(double factor);
 
     std::shared_ptr<LoopSource> source_; // null: no tags

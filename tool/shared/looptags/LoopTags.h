@@ -46,8 +46,11 @@ struct LoopTags {
     bool isEmpty() const { return combined.empty() && info.empty() && transients.empty() && chunks.empty(); }
 };
 
-/// Opens a file that can hold loop chunks; throws Failure, for another OtherKind.
-VireoLoopChunksManager openLoopFile(const std::string& path, platform::AudioFile::Permission permission);
+/// What openLoopFile takes.
+enum class LoopFiles { withLoopChunks, waveToo };
+/// Opens a file that can hold loop chunks, or WAVE where that is asked for; throws Failure, for another OtherKind.
+VireoLoopChunksManager openLoopFile(const std::string& path, platform::AudioFile::Permission permission,
+                                    LoopFiles kinds = LoopFiles::withLoopChunks);
 
 /// Reads all that is known of a file as a loop, and of the chunks that are not interpreted only the sizes. Throws
 /// Failure, for a file of another kind OtherKind.

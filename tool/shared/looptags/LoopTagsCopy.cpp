@@ -4,6 +4,7 @@
 #include "tool/shared/looptags/LoopTagFields.h"
 #include "tool/shared/looptags/LoopTagsPatch.h"
 #include "tool/shared/looptags/TagsCarrier.h"
+#include "tool/shared/looptags/WaveLoopTags.h"
 
 #include <algorithm>
 #include <limits>
@@ -94,12 +95,34 @@ bool writeCarried(VireoLoopChunksManager& manager, const LoopSource& source, con
     });
 }
 
+TagsPlan planCopyToWave(const LoopSource& source, const LoopTags& before, const std::string& target)
+{
+    VireoLoopChunksManager manager = openLoopFile(target, platform::AudioFile::Permission::read, LoopFiles::waveToo);
+    const RawLoopTags chunks = readRawLoopTags(manager);
+    TagsPlan plan;
+    plan.bytes = chunks;
+    assignWaveTags(plan.bytes, source.tags, before);
+    plan.after = tagsWithWaveChunks(target, before, plan.bytes);
+    plan.changes = differences(before, plan.after);
+    if (plan.changes.empty() && plan.bytes != chunks)
+        plan.changes.push_back({"tags", "other bytes", {}});
+    plan.notKept = lossesInWave(source.tags, plan.after);
+    plan.write = [chunks, after = plan.bytes](VireoLoopChunksManager& file) {
+        return writeRawLoopTags(file, chunks, after);
+    };
+    return plan;
+}
+
 } // namespace
 
 std::shared_ptr<LoopSource> readLoopSource(const std::string& path)
 {
     auto source = std::make_shared<LoopSource>();
     source->tags = readOwnLoopTags(path);
+    if (source->tags.fileType != kAIFF && source->tags.fileType != kCaff) {
+        source->bytes = asLoopChunks(source->tags, source->notKept);
+        return source;
+    }
     VireoLoopChunksManager manager = openLoopFile(path, platform::AudioFile::Permission::read);
     manager.readChunks(source->chunks);
     source->bytes = readRawLoopTags(manager);
@@ -109,11 +132,14 @@ std::shared_ptr<LoopSource> readLoopSource(const std::string& path)
 TagsPlan planTagsCopy(const std::shared_ptr<const LoopSource>& source, const LoopTags& before,
                       const std::string& target)
 {
+    if (before.fileType == kWAVE)
+        return planCopyToWave(*source, before, target);
     VireoLoopChunksManager manager = openLoopFile(target, platform::AudioFile::Permission::read);
     const RawLoopTags bytes = readRawLoopTags(manager);
     TagsPlan plan;
     plan.after = before;
     plan.bytes = bytes;
+    plan.notKept = source->notKept;
     TagsCarrier(source->tags, source->bytes, plan.bytes, plan.notKept).carry();
     plan.after.combined = combinedTagsOf(plan.bytes);
     plan.after.info = infoTextsOf(plan.bytes);

@@ -1,4 +1,4 @@
-// All that makes a loop, carried from one file to another, AIFF and CAF in either direction.
+// All that makes a loop, carried from one file to another: AIFF, CAF and WAVE in any direction, and from AIFC.
 #pragma once
 
 #include "loops/VireoLoopChunks.h"
@@ -13,6 +13,7 @@ struct LoopSource {
     LoopTags tags;
     RawLoopTags bytes;
     VireoLoopChunkList chunks = VireoLoopChunks::Empty();
+    std::vector<std::string> notKept; // what of the chunks of others loop tags have no room for, in words
 
     bool isEmpty() const { return tags.isEmpty(); }
 };

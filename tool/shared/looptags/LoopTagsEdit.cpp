@@ -171,13 +171,14 @@ void writeTags(const std::string& path, const TagsPlan& plan)
 {
     bool written = false;
     {
-        VireoLoopChunksManager manager = openLoopFile(path, platform::AudioFile::Permission::readWrite);
+        VireoLoopChunksManager manager =
+            openLoopFile(path, platform::AudioFile::Permission::readWrite, LoopFiles::waveToo);
         errno = 0;
         written = plan.write(manager);
     }
     if (!written)
         throw Failure(errno != 0 ? systemErrorText(errno) : "its tags cannot be written");
-    VireoLoopChunksManager manager = openLoopFile(path, platform::AudioFile::Permission::read);
+    VireoLoopChunksManager manager = openLoopFile(path, platform::AudioFile::Permission::read, LoopFiles::waveToo);
     if (readRawLoopTags(manager) != plan.bytes)
         throw Failure("the tags are not found as they should be after the edit");
     if (const auto wrong = differences(readOwnLoopTags(path), plan.after); !wrong.empty())

@@ -1,8 +1,8 @@
 // The CAF side of LoopTagsPatch.
+#include "audiofile/metadata/CAFTextPairs.h"
 #include "loops/VireoLoopCombinedTagsChunkDataTypes.h"
 #include "loops/VireoLoopTerms.h"
 #include "media/containers/ContainerHeaders.h"
-#include "audiofile/metadata/CAFTextPairs.h"
 #include "tool/shared/looptags/LoopTagsLayouts.h"
 
 #include <fmt/format.h>

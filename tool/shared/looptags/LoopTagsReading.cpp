@@ -160,13 +160,13 @@ LoopTags readTags(const std::string& path, bool withSamplers)
 
 } // namespace
 
-VireoLoopChunksManager openLoopFile(const std::string& path, AudioFile::Permission permission)
+VireoLoopChunksManager openLoopFile(const std::string& path, AudioFile::Permission permission, LoopFiles kinds)
 {
     VireoLoopChunksManager manager(fileLocation(path), permission);
     requireOpen(manager.status(), path);
     const FourCC type = manager.audioFileTypeID();
-    if (type != kAIFF && type != kCaff)
-        throw OtherKind(fmt::format("is {} {} file; loop tags are put into AIFF and CAF files only",
+    if (type != kAIFF && type != kCaff && (type != kWAVE || kinds != LoopFiles::waveToo))
+        throw OtherKind(fmt::format("is {} {} file; loop tags are put into AIFF, CAF and WAVE files only",
                                     type == kAIFC ? "an" : "a", loopContainerName(type)),
                         OtherKind::Kind::audio);
     return manager;

@@ -55,7 +55,7 @@ bool writeItem(AudioFile& file, FourCC id, const std::optional<Bytes>& before, c
 {
     if (before == after)
         return true;
-    const bool byUUID = file.fileType() != kAIFF && id != kInfo;
+    const bool byUUID = file.fileType() == kCaff && id != kInfo;
     if (byUUID) {
         const tagging::UUIDBytes& uuid = *chunkIDToCafChunkUUID(id);
         return after ? VireoLoopUUIDUserDataUtils::write(file, uuid, *after)
@@ -72,6 +72,8 @@ std::optional<Bytes> under(const std::map<FourCC, Bytes>& texts, FourCC id)
 
 std::vector<FourCC> textIDs(FourCC fileType)
 {
+    if (fileType == kWAVE)
+        return {fourCC("acid"), fourCC("smpl")};
     if (fileType == kAIFF)
         return {fourCC("NAME"), fourCC("AUTH"), fourCC("(c) "), fourCC("COMT")};
     return {kInfo};
@@ -84,10 +86,12 @@ RawLoopTags readRawLoopTags(VireoLoopChunksManager& manager)
     AudioFile& file = *manager.audioFile();
     RawLoopTags tags;
     tags.fileType = file.fileType();
-    tags.basic = loopChunk(file, tagging::kBasicTagging);
+    if (tags.fileType != kWAVE) {
+        tags.basic = loopChunk(file, tagging::kBasicTagging);
+        tags.transients = loopChunk(file, tagging::kTransients);
+    }
     if (tags.fileType == kAIFF)
         tags.categories = loopChunk(file, tagging::kCategories);
-    tags.transients = loopChunk(file, tagging::kTransients);
     for (const FourCC id : textIDs(tags.fileType))
         if (auto text = item(file, id, 0))
             tags.texts[id] = std::move(*text);

@@ -7,7 +7,7 @@ import struct
 import subprocess
 import unittest
 
-from command import CommandTest, needs_decoders
+from command import CommandTest, chunk, needs_decoders
 from test_overview import pcm
 
 JUDGE = next((pathlib.Path(__file__).parents[2] / "build" / "judges").glob("waveform-data@*/node_modules/waveform-data"), None)
@@ -77,6 +77,35 @@ class Data(CommandTest):
         right = struct.unpack(f"<{len(samples) // 2}h", samples)[1::2]
         self.assertEqual(self.judged("./a.dat")[0]["points"][0],
                          [[eighth(min(right[at:at + 64])), eighth(max(right[at:at + 64]))] for at in range(0, len(right), 64)])
+
+
+class Points(CommandTest):
+    def points(self, *options):
+        data = json.loads(self.run_command("overview", "a.wav", "--format", "audiowaveform", "-o", "-", *options).stdout)
+        return data["data"]
+
+    def test_any_number_of_channels(self):
+        # Some are folded many samples at once, others one by one.
+        noise = random.Random(3)
+        for channels in (1, 2, 3, 4, 6, 8, 16, 17, 40):
+            lanes = [[noise.randrange(-32768 // (1 + k % 5), 32768 // (1 + k % 3)) for _ in range(1234)] for k in range(channels)]
+            self.write("a.wav", pcm([lane[i] for i in range(1234) for lane in lanes], channels))
+            for frames in (7, 100, 500):
+                with self.subTest(channels=channels, frames=frames):
+                    self.assertTrue(self.points("--channels", "split", "--frames-per-point", str(frames)) == [
+                        eighth(extreme(lane[at:at + frames])) for at in range(0, 1234, frames) for lane in lanes for extreme in (min, max)])
+
+    def test_what_is_no_number_is_silence(self):
+        for channels in (1, 3):
+            samples = [v for v in (math.nan, 0.5, math.nan, -0.25, *[math.nan] * 300, math.inf, -math.inf) for _ in range(channels)]
+            body = struct.pack(f"<{len(samples)}f", *samples)
+            chunks = b"WAVE" + chunk(b"fmt ", struct.pack("<HHIIHH", 3, channels, 8000, 32000 * channels, 4 * channels, 32)) + chunk(b"data", body)
+            self.write("a.wav", b"RIFF" + struct.pack("<I", len(chunks)) + chunks)
+            self.assertEqual(self.points("--channels", "1", "--frames-per-point", "100"), [-32, 64, 0, 0, 0, 0, -128, 127])
+            for options in (("--width", "16"), ("--width", "300"), ("--width", "1000"), ("--gain", "auto")):
+                svg = self.run_command("overview", "a.wav", "--svg", "-", *options).stdout
+                self.assertNotRegex(svg, rb"[^a-z](nan|inf)\b")
+                self.run_command("overview", "a.wav", "--png", "-", *options)
 
 
 class Mistakes(CommandTest):

@@ -7,7 +7,7 @@
 
 namespace {
 
-constexpr float kLeastDistance = 15; // between labels
+constexpr float kLeastDistance = 14; // between labels
 constexpr int kStep = 6;             // decibels
 
 // Decibels of full scale, to a tenth, which three digits leave no room for.

@@ -1,6 +1,7 @@
 #include "tool/overview/SampleColumns.h"
 
 #include <algorithm>
+#include <array>
 #include <cmath>
 #include <limits>
 
@@ -19,40 +20,124 @@ struct Extremes {
     }
 };
 
-Extremes extremesOf(const SoundLane& lane, const float* samples, std::int64_t frames, int channels)
+// A number of samples side by side, of which the compiler makes vectors: where channels divide it, each of them is
+// always of one channel, and one pass finds the extremes of all.
+constexpr int kSide = 16;
+
+constexpr bool divides(int channels)
+{
+    return kSide % channels == 0;
+}
+
+class SideBySide {
+public:
+    // Frames of a number of channels that divides.
+    void fold(const float* samples, std::int64_t count)
+    {
+        low_.fill(std::numeric_limits<float>::infinity());
+        high_.fill(-std::numeric_limits<float>::infinity());
+        std::int64_t done = 0;
+        for (; done + kSide <= count; done += kSide)
+            for (std::size_t i = 0; i < kSide; ++i) {
+                const float sample = samples[done + static_cast<std::int64_t>(i)];
+                low_[i] = sample < low_[i] ? sample : low_[i];
+                high_[i] = sample > high_[i] ? sample : high_[i];
+            }
+        for (std::size_t i = 0; done < count; ++done, ++i) {
+            low_[i] = samples[done] < low_[i] ? samples[done] : low_[i];
+            high_[i] = samples[done] > high_[i] ? samples[done] : high_[i];
+        }
+    }
+
+    Extremes ofChannel(int channel, int channels) const
+    {
+        Extremes extremes;
+        for (auto i = static_cast<std::size_t>(channel); i < kSide; i += static_cast<std::size_t>(channels)) {
+            extremes.low = std::min(extremes.low, low_[i]); // where no sample fell, infinite
+            extremes.high = std::max(extremes.high, high_[i]);
+        }
+        return extremes;
+    }
+
+private:
+    std::array<float, kSide> low_, high_;
+};
+
+Extremes ofChannel(const float* samples, std::int64_t frames, int channel, int channels)
 {
     Extremes extremes;
-    const float* const end = samples + frames * channels;
-    switch (lane.kind) {
-    case SoundLane::Kind::channel:
-        for (const float* at = samples + lane.channel; at < end; at += channels)
-            extremes.add(*at);
-        break;
-    case SoundLane::Kind::sum:
-        for (const float* at = samples; at < end; at += channels) {
-            float sum = 0;
-            for (int channel = 0; channel < channels; ++channel)
-                sum += at[channel];
-            extremes.add(sum / static_cast<float>(channels));
-        }
-        break;
-    case SoundLane::Kind::halves:
-        extremes.low = extremes.high = 0;
-        for (const float* at = samples; at < end; at += 2) {
-            extremes.add(std::abs(at[0]));
-            extremes.add(-std::abs(at[1]));
-        }
-        break;
-    case SoundLane::Kind::folded:
-        extremes.low = extremes.high = 0;
-        for (const float* at = samples; at < end; ++at)
-            extremes.add(*at);
-        break;
-    }
-    if (extremes.low > extremes.high) // nothing but NaNs
-        extremes.low = extremes.high = 0;
+    for (const float* at = samples + channel; at < samples + frames * channels; at += channels)
+        extremes.add(*at);
     return extremes;
 }
+
+Extremes ofSum(const float* samples, std::int64_t frames, int channels)
+{
+    Extremes extremes;
+    for (const float* at = samples; at < samples + frames * channels; at += channels) {
+        float sum = 0;
+        for (int channel = 0; channel < channels; ++channel)
+            sum += at[channel];
+        extremes.add(sum / static_cast<float>(channels));
+    }
+    return extremes;
+}
+
+// The extremes of frames, as lanes want them.
+class RunExtremes {
+public:
+    RunExtremes(const float* samples, std::int64_t frames, int channels)
+        : samples_(samples),
+          frames_(frames),
+          channels_(channels)
+    {
+        if (divides(channels))
+            all_.fold(samples, frames * channels);
+    }
+
+    Extremes of(const SoundLane& lane) const
+    {
+        Extremes extremes;
+        switch (lane.kind) {
+        case SoundLane::Kind::channel:
+            extremes = ofChannel(lane.channel);
+            break;
+        case SoundLane::Kind::sum:
+            extremes = ofSum(samples_, frames_, channels_);
+            break;
+        case SoundLane::Kind::halves: {
+            const Extremes left = ofChannel(0), right = ofChannel(1);
+            extremes.low = std::min({0.0F, right.low, -right.high});
+            extremes.high = std::max({0.0F, left.high, -left.low});
+            break;
+        }
+        case SoundLane::Kind::folded:
+            extremes.low = extremes.high = 0;
+            for (int channel = 0; channel < channels_; ++channel) {
+                const Extremes one = ofChannel(channel);
+                extremes.add(one.low);
+                extremes.add(one.high);
+            }
+            break;
+        }
+        if (extremes.low > extremes.high) // nothing but NaNs
+            extremes.low = extremes.high = 0;
+        return extremes;
+    }
+
+private:
+    Extremes ofChannel(int channel) const
+    {
+        const Extremes extremes = divides(channels_) ? all_.ofChannel(channel, channels_)
+                                                     : ::ofChannel(samples_, frames_, channel, channels_);
+        return extremes.low > extremes.high ? Extremes{0, 0} : extremes;
+    }
+
+    const float* samples_;
+    std::int64_t frames_;
+    int channels_;
+    SideBySide all_;
+};
 
 } // namespace
 
@@ -89,9 +174,9 @@ void SampleColumns::add(const float* samples, std::int64_t frame, std::int64_t f
         const std::int64_t until = std::min(end(column), stop);
         for (std::int64_t from = std::max(begin(column), frame); from < until; from += kRun) {
             const std::int64_t count = std::min(kRun, until - from);
-            const float* const run = samples + (from - frame) * channels_;
+            const RunExtremes run(samples + (from - frame) * channels_, count, channels_);
             for (std::size_t lane = 0; lane < lanes_.size(); ++lane) {
-                const Extremes extremes = extremesOf(lanes_[lane], run, count, channels_);
+                const Extremes extremes = run.of(lanes_[lane]);
                 Fold& fold = folds_[lane][column];
                 fold.low = fold.frames > 0 ? std::min(fold.low, extremes.low) : extremes.low;
                 fold.high = fold.frames > 0 ? std::max(fold.high, extremes.high) : extremes.high;

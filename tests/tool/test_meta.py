@@ -219,6 +219,10 @@ class Meta(CommandTest):
         entries = struct.pack(">I", 2000) + b"".join(struct.pack(">Iq", i, 0) for i in range(2000)) + b"a" * 100_000
         self.write("overlapping.caf", caf((b"strg", entries)))
         self.assertLess(len(self.run_command("meta", "overlapping.caf").stdout), 400_000)
+        # Nor are lists read whose fields would fill the memory.
+        self.write("long.wav", wave(chunk(b"cue ", struct.pack("<I", 90_000) + point(1, 2) * 90_000), EVERYTHING[0]))
+        long = {item["field"]: item.get("size") for item in self.record("meta", "long.wav")["fields"]}
+        self.assertEqual((long["cue"], "bext.description" in long), (4 + 24 * 90_000, True))
 
 
 if __name__ == "__main__":

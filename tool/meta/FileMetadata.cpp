@@ -11,6 +11,7 @@
 namespace {
 
 constexpr std::int64_t kMostBytes = 16 << 20; // of all chunks that are held whole
+constexpr std::int64_t kMostOfList = 2 << 20; // of one of numbers, of which fields are fifty times as large
 constexpr std::int64_t kHead = 64;            // of the others
 
 // What `info` and `chunks` tell of: coding, samples, room that is not used.
@@ -51,6 +52,16 @@ const MetaReader* readerOf(FourCC id, std::span<const MetaReader> readers)
     return reader == readers.end() ? nullptr : &*reader;
 }
 
+/// How long a chunk may be that is held whole.
+std::int64_t mostOf(const MetaReader& reader)
+{
+    if (reader.read == readPreview)
+        return 0;
+    const bool isText =
+        reader.read == readText || reader.read == readIXML || reader.read == readADM || reader.read == readID3;
+    return isText ? kMostBytes : kMostOfList;
+}
+
 /// The chunks that may be metadata, in the order of the file; with `extent` of the container.
 MetaSource collect(CAudioFileIO& file, ContainerExtent& extent)
 {
@@ -67,7 +78,7 @@ MetaSource collect(CAudioFileIO& file, ContainerExtent& extent)
             chunk.size = std::max<std::int64_t>(entry.size, 0);
             const std::int64_t there = std::clamp<std::int64_t>(extent.fileLength - entry.body, 0, chunk.size);
             const MetaReader* const reader = readerOf(entry.id, readersOf(extent));
-            chunk.isHeld = reader != nullptr && reader->read != readPreview && there <= room;
+            chunk.isHeld = reader != nullptr && there <= std::min(room, mostOf(*reader));
             chunk.body.resize(static_cast<std::size_t>(chunk.isHeld ? there : std::min(there, kHead)));
             room -= std::ssize(chunk.body);
             if (!chunk.body.empty())

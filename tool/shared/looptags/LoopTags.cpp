@@ -215,6 +215,27 @@ std::string sourceOf(const LoopTags& tags, std::string_view name)
     return holdsLoopChunks && source != "INST" && source != "MARK" ? "" : shown;
 }
 
+// Of all values: where no sampler's chunk said it, a loop chunk did. By the AIFF ids in either kind of file, but for
+// the texts of CAF, which stand in "info".
+std::map<std::string, std::string, std::less<>> sourcesOf(const LoopTags& tags)
+{
+    constexpr std::string_view inCategories[] = {"instrumentType", "instrumentSubType", "genre", "descriptors"};
+    constexpr std::pair<std::string_view, const char*> texts[] = {
+        {"title", "NAME"}, {"artist", "AUTH"}, {"copyright", "(c) "}, {"comments", "COMT"}};
+    const bool isAIFF = tags.fileType == kAIFF;
+    auto sources = tags.sources;
+    for (const TagValue& tag : tagValues(tags)) {
+        const auto* const text = std::ranges::find(texts, tag.name, [](const auto& each) { return each.first; });
+        const bool isInCategories = std::ranges::find(inCategories, tag.name) != std::end(inCategories);
+        sources.try_emplace(tag.name, text != std::end(texts)    ? isAIFF ? text->second : "info"
+                                      : isAIFF && isInCategories ? "cate"
+                                                                 : "basc");
+    }
+    if (!tags.transients.empty())
+        sources.emplace("transients", "trns");
+    return sources;
+}
+
 } // namespace
 
 std::int64_t LoopTags::number(std::string_view key) const
@@ -338,9 +359,9 @@ void writeLoopTags(JsonWriter& json, const std::string& path, const LoopTags& ta
             json.beginObject().member("id", chunk.id).member("size", chunk.size).endObject();
         json.endArray();
     }
-    if (!tags.sources.empty()) {
+    if (const auto sources = sourcesOf(tags); !sources.empty()) {
         json.key("sources").beginObject();
-        for (const auto& [name, chunk] : tags.sources)
+        for (const auto& [name, chunk] : sources)
             json.member(name, chunk);
         json.endObject();
     }

@@ -33,7 +33,7 @@ struct LoopTags {
     bool hasLoopChunks = false; // of this library's kind
     SamplerTags sampler;        // what it says stands in the dictionaries too, where the loop chunks say nothing
     double statedTempo = 0;     // in beats per minute, of a chunk that says it
-    std::map<std::string, std::string, std::less<>> sources; // by the names of tags, the chunks that they come from
+    std::map<std::string, std::string, std::less<>> sources; // of what it said: by the names of tags, its chunks
 
     /// The number or text under a key of either dictionary; 0 or "" when there is none.
     std::int64_t number(std::string_view key) const;

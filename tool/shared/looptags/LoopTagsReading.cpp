@@ -111,23 +111,6 @@ void readLoopChunks(VireoLoopChunksManager& manager, LoopTags& tags)
     tags.hasLoopChunks = !tags.combined.empty() || !tags.transients.empty() || !tags.chunks.empty();
 }
 
-// By the AIFF ids in either kind of file; texts of CAF stand in "info".
-void nameLoopChunks(LoopTags& tags)
-{
-    constexpr std::string_view inCategories[] = {"instrumentType", "instrumentSubType", "genre", "descriptors"};
-    constexpr std::pair<std::string_view, const char*> texts[] = {
-        {"title", "NAME"}, {"artist", "AUTH"}, {"copyright", "(c) "}, {"comments", "COMT"}};
-    for (const TagValue& tag : tagValues(tags)) {
-        const auto* const text = std::ranges::find(texts, tag.name, [](const auto& each) { return each.first; });
-        tags.sources[tag.name] =
-            text != std::end(texts) ? tags.fileType == kAIFF ? text->second : "info"
-            : tags.fileType == kAIFF && std::ranges::find(inCategories, tag.name) != std::end(inCategories) ? "cate"
-                                                                                                            : "basc";
-    }
-    if (!tags.transients.empty())
-        tags.sources["transients"] = "trns";
-}
-
 std::string sourceName(FourCC id)
 {
     return id == fourCC("INFO") || id == fourCC("adtl") ? "LIST " + fourCCText(id) : fourCCText(id);
@@ -146,10 +129,8 @@ LoopTags readTags(const std::string& path, bool withSamplers)
     if (tags.fileType == fourCC("NeXT"))
         throw OtherKind("is an AU file; those hold no tags", OtherKind::Kind::audio);
     readLength(file, path, tags);
-    if (holdsLoopChunks) {
+    if (holdsLoopChunks)
         readLoopChunks(manager, tags);
-        nameLoopChunks(tags);
-    }
     if (withSamplers || !holdsLoopChunks) {
         SamplerTags sampler;
         requireOK(SamplerTags::read(file, sampler));

@@ -21,7 +21,8 @@ AudioFileInfo describeFile(const std::string& path, bool quiet)
     if (info.framesAreStated) { // by a header: the decoder, where there is one, counts
         CAudioFileIO audio;
         openAudio(audio, path);
-        audio.OpenDecoder();
+        if (audio.OpenDecoder() == kStatusIOError) // it is there, and nothing can be decoded
+            failForSound(path, kStatusIOError);
         return audio.Info();
     }
     return info;

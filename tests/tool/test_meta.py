@@ -202,6 +202,23 @@ class Meta(CommandTest):
                 self.assertIn(ours["bext.originator"], media["Producer"])
         self.assertEqual(self.fields("ffmpeg.wav")["bext.codingHistory[0]"], "A=PCM,F=44100")
 
+    def test_tags_of_files_without_chunks(self):
+        """As ffprobe reads them, under the keys of each system."""
+        titles = {"mp3": "id3v2.TIT2", "flac": "vorbis.TITLE", "ogg": "vorbis.TITLE", "m4a": "mp4.\xa9nam", "wma": "asf.Title", "wv": "ape.title"}
+        for kind, field in titles.items():
+            with self.subTest(kind=kind):
+                name = f"a.{kind}"
+                subprocess.run(["ffmpeg", "-nostdin", "-loglevel", "error", "-f", "lavfi", "-i", "sine=d=0.2", "-metadata", "title=Gänge",
+                                "-metadata", "track=3/9", name], cwd=self.folder, check=True)
+                fields = self.fields(name)
+                self.assertEqual(fields[field], "Gänge")
+                self.assertIn("3/9", fields.values())
+        self.assertEqual(self.run_command("meta", "-", stdin=(self.folder / "a.mp3").read_bytes(), status=0).stdout.splitlines()[0],
+                         "id3v2.TIT2\tGänge".encode())
+        self.assertEqual(self.fields("--only", "vorbis", "a.mp3"), {})
+        self.write("text.mp3", b"no sound")
+        self.assertIn("text.mp3: ", self.failure("meta", "text.mp3"))
+
     def test_damaged_files_are_read_or_refused(self):
         sources = [wave(*EVERYTHING), caf((b"strg", struct.pack(">I", 60) + struct.pack(">Iq", 1, 0) * 60 + b"a" * 900),
                                           (b"mark", struct.pack(">II", 0, 90) + struct.pack(">4sdI4bII", b"rbeg", 1, 1, 0, 0, 0, 0, 0, 0) * 30))]

@@ -1,7 +1,7 @@
-#include "media/tags/EmbeddedTags.h"
 #include "platform/core/ByteReader.h"
 #include "platform/core/Status.h"
 #include "tool/meta/MetaReaders.h"
+#include "tool/meta/TagReader.h"
 
 bool readText(const MetaChunk& chunk, const MetaSource&, MetaFields& fields)
 {
@@ -34,12 +34,8 @@ bool readID3(const MetaChunk& chunk, const MetaSource&, MetaFields& fields)
     }
     if (tags.empty())
         return false;
-    for (const platform::EmbeddedTag& tag : tags) {
-        for (const std::string& value : tag.values)
-            fields.text(tag.key, value, tag.name);
-        if (tag.values.empty())
-            fields.preview(tag.key, tag.head, tag.size, tag.pictureKind.empty() ? tag.mimeType : tag.pictureKind);
-    }
+    for (const platform::EmbeddedTag& tag : tags)
+        addTag(tag, fields);
     return true;
 }
 

@@ -1,6 +1,7 @@
 #include "tool/meta/FileMetadata.h"
 
 #include "tool/meta/MetaReaders.h"
+#include "tool/meta/TagReader.h"
 #include "tool/shared/input/InputFile.h"
 #include "tool/shared/output/Failure.h"
 
@@ -107,18 +108,23 @@ void readChunk(const MetaChunk& chunk, std::span<const MetaReader> readers, cons
         fields.preview("", chunk.body, static_cast<std::uint64_t>(chunk.size));
 }
 
-} // namespace
-
-FileMetadata readMetadata(const std::string& path, const MetaGroups& groups)
+FileMetadata readChunks(CAudioFileIO& file)
 {
-    CAudioFileIO file;
-    openChunks(file, path);
     ContainerExtent extent;
     const MetaSource source = collect(file, extent);
     MetaFields fields(file.Info().exactSampleRate);
     for (const MetaChunk& chunk : source.chunks)
         readChunk(chunk, readersOf(extent), source, fields);
-    FileMetadata metadata{extent.id, fields.take()};
+    return {extent.id, fields.take()};
+}
+
+} // namespace
+
+FileMetadata readMetadata(const std::string& path, const MetaGroups& groups)
+{
+    CAudioFileIO file;
+    requireOK(file.OpenForChunks(referenceTo(path), 0));
+    FileMetadata metadata = file.HasChunks() ? readChunks(file) : readTags(file, path);
     if (!groups.empty())
         std::erase_if(metadata.fields, [&](const MetaField& field) {
             return std::ranges::find(groups, lowered(field.group)) == groups.end();
@@ -132,5 +138,7 @@ std::vector<std::string> metaGroups()
     for (const auto& readers : {waveReaders(), aiffReaders(), cafReaders()})
         for (const MetaReader& reader : readers)
             groups.insert(lowered(reader.group));
+    for (const std::string_view group : tagGroups())
+        groups.emplace(group);
     return {groups.begin(), groups.end()};
 }

@@ -4,16 +4,16 @@
 #include "tool/meta/MetaFields.h"
 
 struct FileMetadata {
-    FourCC container = 0; // the outermost id: "RIFF", "FORM", "caff" …
+    FourCC container = 0; // the outermost id: "RIFF", "FORM", "caff" …; 0 of a file without chunks
     std::vector<MetaField> fields;
 };
 
 /// Which groups of fields are wanted, in small letters; empty: all.
 using MetaGroups = std::vector<std::string>;
 
-/// Of WAVE, RF64, BW64, RIFX, Wave64, AIFF, AIFC and CAF files; throws Failure, for another OtherKind. Chunks that say
-/// how samples are coded, and room that is not used, are left out; of those that nobody here knows the first bytes are
-/// shown.
+/// The chunks of WAVE, RF64, BW64, RIFX, Wave64, AIFF, AIFC and CAF files, and the tags of others; throws Failure.
+/// Chunks that say how samples are coded, and room that is not used, are left out; of those that nobody here knows the
+/// first bytes are shown.
 FileMetadata readMetadata(const std::string& path, const MetaGroups& groups);
 
 /// The groups by which fields go, of all containers, each once.

@@ -52,7 +52,9 @@ void writeField(JsonWriter& json, const MetaField& field)
     json.knownMember("size", field.byteSize).knownMember("ascii", field.ascii);
     if (field.isLatin1)
         json.member("encoding", kLatin1);
-    json.member("chunk", fourCCText(field.chunk)).member("offset", field.offset).endObject();
+    if (field.chunk != 0)
+        json.member("chunk", fourCCText(field.chunk)).member("offset", field.offset);
+    json.endObject();
 }
 
 /// RFC 4180.
@@ -105,7 +107,9 @@ private:
     void addRecord(const std::string& path, const FileMetadata& metadata)
     {
         JsonWriter& json = json_.begin();
-        json.beginObject().member("path", path).member("container", fourCCText(metadata.container));
+        json.beginObject().member("path", path);
+        if (metadata.container != 0)
+            json.member("container", fourCCText(metadata.container));
         json.key("fields").beginArray();
         for (const MetaField& field : metadata.fields)
             writeField(json, field);
@@ -119,15 +123,17 @@ private:
             output_.print("{},{},{},{},{},{},{},{},{}\r\n", quoted(path), quoted(field.fullName()),
                           quoted(valueText(field)), field.seconds ? fmt::format("{}", *field.seconds) : "",
                           quoted(field.words), field.byteSize ? fmt::format("{}", *field.byteSize) : "",
-                          field.isLatin1 ? kLatin1 : "", quoted(fourCCText(field.chunk)), field.offset);
+                          field.isLatin1 ? kLatin1 : "", field.chunk != 0 ? quoted(fourCCText(field.chunk)) : "",
+                          field.chunk != 0 ? fmt::format("{}", field.offset) : "");
     }
 
     /// A heading for each chunk, its fields below it, their values in one column.
     void addTree(const std::string& path, const FileMetadata& metadata)
     {
         constexpr int widest = 40;
-        output_.print("{}{}{}{}  {}\n", isFirst_ ? "" : "\n", bold(), printable(path), plain(),
-                      fourCCText(metadata.container));
+        output_.print("{}{}{}{}{}{}\n", isFirst_ ? "" : "\n", bold(), printable(path), plain(),
+                      metadata.container != 0 ? "  " : "",
+                      metadata.container != 0 ? fourCCText(metadata.container) : "");
         isFirst_ = false;
         const MetaField* above = nullptr;
         for (const MetaField& field : metadata.fields) {
@@ -137,8 +143,9 @@ private:
                 for (const MetaField& other : metadata.fields)
                     if (other.place == field.place && other.offset == field.offset)
                         width_ = std::max(width_, std::min(displayWidth(label(other)), widest));
-                output_.print("  {}{}{}  \"{}\" at {}\n", bold(), printable(field.place), plain(),
-                              fourCCText(field.chunk), field.offset);
+                const std::string chunk =
+                    field.chunk != 0 ? fmt::format("  \"{}\" at {}", fourCCText(field.chunk), field.offset) : "";
+                output_.print("  {}{}{}{}\n", bold(), printable(field.place), plain(), chunk);
             }
             const std::string text = label(field);
             const int room = std::max(width_ - displayWidth(text), 0);
@@ -187,7 +194,8 @@ MetaGroups groupsFromText(const std::string& text)
         const std::size_t end = std::min(text.find(',', begin), text.size());
         const std::string group = lowered(text.substr(begin, end - begin));
         if (group.empty() || (group.size() > kIdLength && std::ranges::find(known, group) == known.end()))
-            throw UsageError("\"" + printable(group) + "\" names no fields: bext, ixml, info, cue … or a chunk's id");
+            throw UsageError("\"" + printable(group) +
+                             "\" names no fields: bext, ixml, info, cue, id3v2 … or a chunk's id");
         groups.push_back(group);
         begin = end + 1;
     }
@@ -211,12 +219,12 @@ void declareMeta(CommandLine& commandLine)
     static FileArguments files;
     static MetaOptions wanted;
     static std::string only;
-    Verb& verb = commandLine.addVerb("meta", "Show what WAVE, RF64, AIFF and CAF files say about themselves, by field",
-                                     [&commandLine] {
-                                         if (!only.empty())
-                                             wanted.only = groupsFromText(only);
-                                         return runMeta(files, wanted, commandLine.output());
-                                     });
+    Verb& verb =
+        commandLine.addVerb("meta", "Show what files say about themselves, by field: chunks and tags", [&commandLine] {
+            if (!only.empty())
+                wanted.only = groupsFromText(only);
+            return runMeta(files, wanted, commandLine.output());
+        });
     CommandLine::addFilesOrInput(verb, files);
     addThreads(verb, wanted.threads);
     verb.addFlag("--csv", wanted.isCSV, "Print comma-separated values (RFC 4180), with a header");

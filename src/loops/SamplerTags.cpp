@@ -78,10 +78,10 @@ std::string trimmed(const std::string& text)
 }
 
 template <class T, class From>
-void setFirst(std::optional<SamplerTags::Sourced<T>>& value, From from, FourCC source)
+void setFirst(std::optional<SamplerTagValue<T>>& value, From from, FourCC source)
 {
     if (!value)
-        value = SamplerTags::Sourced<T>{static_cast<T>(from), source};
+        value = SamplerTagValue<T>{static_cast<T>(from), source};
 }
 
 /// Takes one chunk after the other.

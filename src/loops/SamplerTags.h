@@ -24,14 +24,14 @@ struct SamplerTagChunk {
     Bytes body;
 };
 
-struct KT_EXPORT SamplerTags {
-    /// `source` is the id of the chunk; of a LIST its form.
-    template <class T>
-    struct Sourced {
-        T value{};
-        FourCC source = 0;
-    };
+/// A value and the chunk that it comes from, by its id; of a LIST by its form.
+template <class T>
+struct SamplerTagValue {
+    T value{};
+    FourCC source = 0;
+};
 
+struct KT_EXPORT SamplerTags {
     /// A part of the sound that is played again and again; both frames are played.
     struct Loop {
         enum class Kind : std::uint8_t { forward, alternating, backward, other };
@@ -58,12 +58,12 @@ struct KT_EXPORT SamplerTags {
         FourCC source = 0;
     };
 
-    std::optional<Sourced<bool>> isLoop;           // false: a sound that is played once
-    std::optional<Sourced<double>> tempo;          // in beats per minute
-    std::optional<Sourced<std::int64_t>> beats;    // above 0
-    std::optional<Sourced<std::int64_t>> rootNote; // MIDI, 1 to 127, 60 = middle C
-    std::optional<Sourced<std::int64_t>> signatureTop;
-    std::optional<Sourced<std::int64_t>> signatureBottom;
+    std::optional<SamplerTagValue<bool>> isLoop;           // false: a sound that is played once
+    std::optional<SamplerTagValue<double>> tempo;          // in beats per minute
+    std::optional<SamplerTagValue<std::int64_t>> beats;    // above 0
+    std::optional<SamplerTagValue<std::int64_t>> rootNote; // MIDI, 1 to 127, 60 = middle C
+    std::optional<SamplerTagValue<std::int64_t>> signatureTop;
+    std::optional<SamplerTagValue<std::int64_t>> signatureBottom;
     std::vector<Loop> loops;
     std::vector<Marker> markers; // in the order of the file
     std::vector<Text> texts;     // one of a kind

@@ -55,7 +55,7 @@ _ktfiles()
         fi
     elif [[ $cur == -* ]]; then
         case $verb/$object in
-            info/*) COMPREPLY=($(compgen -W "--long --check --md5 --sha256 --threads $files $common" -- "$cur")) ;;
+            info/*) COMPREPLY=($(compgen -W "--csv --long --check --md5 --sha256 --threads $files $common" -- "$cur")) ;;
             chunks/get) COMPREPLY=($(compgen -W "--output --force --sidecar $common" -- "$cur")) ;;
             chunks/add) COMPREPLY=($(compgen -W "--from --replace --sidecar --force $edit $common" -- "$cur")) ;;
             chunks/remove) COMPREPLY=($(compgen -W "--sidecar --force $edit $common" -- "$cur")) ;;
@@ -68,8 +68,9 @@ _ktfiles()
             lock/*) COMPREPLY=($(compgen -W "--read --write --presenter --timeout -- $common" -- "$cur")) ;;
             scan/*) COMPREPLY=($(compgen -W "--csv --threads $files $common" -- "$cur")) ;;
             meta/*) COMPREPLY=($(compgen -W "--only --csv --threads $files $common" -- "$cur")) ;;
-            tags/*) COMPREPLY=($(compgen -W "--threads $files $common" -- "$cur")) ;;
-            chunks/* | pair/*) COMPREPLY=($(compgen -W "$files $common" -- "$cur")) ;;
+            tags/*) COMPREPLY=($(compgen -W "--csv --threads $files $common" -- "$cur")) ;;
+            pair/*) COMPREPLY=($(compgen -W "--csv $files $common" -- "$cur")) ;;
+            chunks/*) COMPREPLY=($(compgen -W "$files $common" -- "$cur")) ;;
             project/media) COMPREPLY=($(compgen -W "--missing --alternative $common" -- "$cur")) ;;
             project/dirs) COMPREPLY=($(compgen -W "--create --alternative --timeout $common" -- "$cur")) ;;
             project/backup) COMPREPLY=($(compgen -W "--keep --alternative --dry-run --timeout $common" -- "$cur")) ;;

@@ -1,10 +1,16 @@
-"""What people see: tables that fit their terminal, whatever scripts the names are written in."""
+"""What people see: tables that fit their terminal, whatever scripts the names are written in, and progress."""
+import fcntl
 import os
+import re
 import shutil
+import signal
+import struct
+import subprocess
+import termios
 import unicodedata
 import unittest
 
-from command import MEDIA, CommandTest
+from command import KTFILES, MEDIA, CommandTest, wave
 
 NAMES = ("drums and percussion, all of them/a loop of the first day.L.wav", "drums and percussion, all of them/a loop of the first day.R.wav",
          "日本の太鼓ループ/和太鼓アンサンブル.wav", "🎹🥁👍🏽 emoji/beat 🔥.wav", "e\u0301te\u0301 de\u0301compose\u0301.wav", "한국어/\u1112\u1161\u11ab.wav")
@@ -72,6 +78,74 @@ class Terminal(CommandTest):
                 text = "\n".join(self.lines(*arguments, *color, "lib", env={**os.environ, "COLUMNS": "40"}))
                 self.assertNotIn("…", text)
                 self.assertIn("drums and percussion, all of them/a loop of the first day.", text)
+
+
+class Progress(CommandTest):
+    """A line on standard error while people wait. What takes long is the digest of a file that is a hole."""
+
+    def setUp(self):
+        super().setUp()
+        self.slow = ["info", "--md5", "-j", "1"]
+        for name in ("slow of the first day.wav", "slow.wav"):
+            with open(self.write(name, wave(size=0xFFFFFFF0)), "r+b") as file:
+                file.seek(40)
+                file.write(struct.pack("<I", 1 << 30))
+                file.truncate(44 + (1 << 30))
+        self.write("bad.wav", b"")
+
+    def typed(self, command, columns=60, interrupt=False):
+        """All that a terminal gets of a shell's command, and the exit status."""
+        ours, theirs = os.openpty()
+        fcntl.ioctl(theirs, termios.TIOCSWINSZ, struct.pack("HHHH", 24, columns, 0, 0))
+        text = b""
+        environment = {**os.environ, "TERM": "xterm", "NO_COLOR": "1"}
+        with subprocess.Popen(["bash", "-c", f"exec {command}"], stdin=theirs, stdout=theirs, stderr=theirs, cwd=self.folder, env=environment,
+                              start_new_session=True, preexec_fn=lambda: fcntl.ioctl(0, termios.TIOCSCTTY)) as process:
+            os.close(theirs)
+            try:
+                while piece := os.read(ours, 65536):
+                    text += piece
+                    if interrupt and b"left" in text:
+                        os.write(ours, b"\3")
+                        interrupt = False
+            except OSError:  # EIO: the other side is gone
+                pass
+        os.close(ours)
+        return text.decode(), process.returncode
+
+    def screen(self, text):
+        """What is to be seen at the end."""
+        lines = []
+        for line in text.replace("\r\n", "\n").split("\n"):
+            shown = ""
+            for part in re.split("\r", line):
+                kept, *more = part.split("\x1b[K")
+                shown = kept + ("" if more else shown[len(kept):]) + "".join(more)
+            lines.append(shown)
+        return "\n".join(lines)
+
+    def test_tells_what_is_done_how_much_of_it_and_the_time_left_and_is_gone(self):
+        for names, numbers in (('"slow of the first day.wav" bad.wav slow.wav', "[012] of 3 files"), ("slow.wav", r"\d+%")):
+            command = f"{KTFILES} {' '.join(self.slow)} {names}"
+            for columns in (80, 44, 24):
+                text, status = self.typed(command, columns)
+                drawn = re.findall("\r(reading[^\r]*)\x1b\\[K", text)
+                self.assertGreater(len(drawn), 1, text)
+                self.assertLess(len(drawn), 150)
+                self.assertEqual([line for line in drawn if len(line) >= columns], [])
+                if columns > 24:
+                    self.assertRegex(drawn[-1], rf"^reading {numbers}, \d:\d\d left")
+                if columns == 80:
+                    self.assertRegex(drawn[0], "slow.*wav$")
+                self.assertEqual("█" in drawn[-1], columns == 80)
+                self.assertEqual(self.screen(text), self.screen(self.typed(command + " 2> >(cat >&2)", columns)[0]))
+                self.assertEqual("ktfiles: bad.wav: is empty\n" in self.screen(text), "bad" in names)
+        for quiet in (f"{command} -q", f"{command} 2>/dev/null"):
+            self.assertNotIn("reading", self.typed(quiet)[0])
+
+    def test_an_interrupt_clears_the_line(self):
+        text, status = self.typed(f"{KTFILES} {' '.join(self.slow)} slow.wav", interrupt=True)
+        self.assertEqual((status, self.screen(text).replace("^C", "")), (-signal.SIGINT, ""))
 
 
 if __name__ == "__main__":

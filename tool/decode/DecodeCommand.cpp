@@ -75,7 +75,7 @@ bool runDecode(DecodeArguments& arguments, OutputOptions output)
     DecodeTargets targets(arguments.out, *arguments.options.wishes.format);
     DecodeReport report(toOutput ? Form::none : outputForm(output), output);
     const FoundFiles found{names.front(), targets.plan(names)};
-    arguments.options.showsProgress = !output.quiet && found.files.size() == 1;
+    arguments.options.showsProgress = !output.quiet;
     prepareOutputFiles();
     // Each has a temporary file, and the system's signals remove no more.
     const FileLoop loop{.threads = std::min(threadsFor(arguments.threads), kMostTemporaryFiles),

@@ -7,7 +7,10 @@
 #include "tool/shared/access/FileAccess.h"
 #include "tool/shared/input/FileByFile.h"
 #include "tool/shared/input/InputFile.h"
+#include "tool/shared/output/CsvRecords.h"
+#include "tool/shared/output/DisplayWidth.h"
 #include "tool/shared/output/JsonRecords.h"
+#include "tool/shared/output/Progress.h"
 
 namespace {
 
@@ -58,8 +61,12 @@ std::vector<Problem> problemsOf(const std::string& path, bool quiet)
         CAudioFileIO file;
         requireOK(file.OpenForChunks(referenceTo(path), 0));
         std::int32_t status = CheckAudioFile(file, findings);
+        Progress progress("checking", file.Info().dataSize, quiet, path);
         if (status == kStatusOK)
-            status = CheckStatedDigest(file, findings);
+            status = CheckStatedDigest(file, findings, [&] {
+                progress.advance(1 << 20); // it asks ahead of each MiB
+                return true;
+            });
         for (const platform::ContainerFinding& finding : findings) {
             const FindingWords words = wordsOf(finding);
             problems.push_back({words.name, words.text, words.effect, finding.chunk, finding.offset});
@@ -80,19 +87,34 @@ std::vector<Problem> problemsOf(const std::string& path, bool quiet)
 
 class CheckWriter {
 public:
-    explicit CheckWriter(const OutputOptions& options) : form_(outputForm(options)), json_(options) {}
+    explicit CheckWriter(const OutputOptions& options)
+        : form_(outputForm(options)),
+          json_(options),
+          csv_(options, kColumns)
+    {
+    }
 
     void add(const std::string& path, const std::vector<Problem>& problems)
     {
         isGood_ = isGood_ && problems.empty();
         if (form_ == Form::json)
             addRecord(path, problems);
+        else if (form_ == Form::csv)
+            addRows(path, problems);
         else if (form_ != Form::none)
             for (const Problem& problem : problems)
-                output_.print("{}: {}{}; {}\n", printable(path), placeText(problem), problem.text, problem.effect);
+                addLine(fmt::format("{}: {}{}; {}", printable(path), placeText(problem), problem.text, problem.effect));
     }
-    void addFailure(const std::string& path, const std::string& text) { json_.addFailure(path, text); }
-    void finish() { json_.finish(); }
+    void addFailure(const std::string& path, const std::string& text)
+    {
+        json_.addFailure(path, text);
+        csv_.addFailure(path, text);
+    }
+    void finish()
+    {
+        json_.finish();
+        csv_.finish();
+    }
     bool isGood() const { return isGood_; }
 
 private:
@@ -108,19 +130,41 @@ private:
         json.beginObject().member("path", path);
         json.key("findings").beginArray();
         for (const Problem& problem : problems) {
-            json.beginObject().member("kind", problem.name);
-            if (problem.chunk != 0)
-                json.member("id", fourCCText(problem.chunk)).member("offset", problem.offset);
-            json.member("text", problem.text).member("effect", problem.effect).endObject();
+            recordOf(problem, {}).write(json.beginObject());
+            json.endObject();
         }
         json.endArray().endObject();
         json_.end();
     }
+    /// One for each finding; of a file in which all is well one that has the path alone.
+    void addRows(const std::string& path, const std::vector<Problem>& problems)
+    {
+        const Record file = Record().member("path", path);
+        if (problems.empty())
+            csv_.add(file);
+        for (const Problem& problem : problems)
+            csv_.add(recordOf(problem, file));
+    }
+    static Record recordOf(const Problem& problem, Record record)
+    {
+        record.member("kind", problem.name);
+        if (problem.chunk != 0)
+            record.member("id", fourCCText(problem.chunk)).member("offset", problem.offset);
+        return record.member("text", problem.text).member("effect", problem.effect);
+    }
+    void addLine(const std::string& line)
+    {
+        const std::optional<int> columns = columnsOfOutput();
+        output_.print("{}\n", columns ? wrapped(line, *columns, 0, 4) : line);
+    }
+
+    static constexpr const char* kColumns[] = {"path", "kind", "id", "offset", "text", "effect", "error"};
 
     Form form_;
     bool isGood_ = true;
     Output& output_ = Output::standard();
     JsonRecords json_;
+    CsvRecords csv_;
 };
 
 } // namespace

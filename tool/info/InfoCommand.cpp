@@ -10,8 +10,9 @@
 #include "tool/shared/input/FileFacts.h"
 #include "tool/shared/input/InputFile.h"
 #include "tool/shared/output/ClockTime.h"
+#include "tool/shared/output/DataRecords.h"
 #include "tool/shared/output/Failure.h"
-#include "tool/shared/output/JsonRecords.h"
+#include "tool/shared/output/Progress.h"
 #include "tool/shared/output/Table.h"
 
 #include <cmath>
@@ -111,53 +112,89 @@ void addDigests(Description& description, const std::string& path, const InfoOpt
         digests.push_back(&md5);
     if (wanted.wantsSHA256)
         digests.push_back(&sha256);
-    requireOK(DigestAudio(file, info, digests));
+    constexpr std::int64_t askedEvery = 1 << 20;
+    Progress progress("reading", info.dataSize, quiet, path);
+    requireOK(DigestAudio(file, info, digests, [&] {
+        progress.advance(askedEvery);
+        return true;
+    }));
     if (wanted.wantsMD5)
         description.md5 = hexText(md5.finish());
     if (wanted.wantsSHA256)
         description.sha256 = hexText(sha256.finish());
 }
 
-void writeJson(JsonWriter& json, const std::string& path, const Description& description)
+constexpr const char* kColumns[] = {"path",
+                                    "container",
+                                    "containerName",
+                                    "fileType",
+                                    "formatCode",
+                                    "coding",
+                                    "sampleRate",
+                                    "bitsPerSample",
+                                    "sourceBits",
+                                    "floatingPoint",
+                                    "bitRate",
+                                    "dsdRate",
+                                    "channels",
+                                    "channelLayout",
+                                    "audioTracks",
+                                    "frames",
+                                    "durationSeconds",
+                                    "isWhole",
+                                    "missingBytes",
+                                    "promisedFrames",
+                                    "md5",
+                                    "sha256",
+                                    "dataOffset",
+                                    "fileLength",
+                                    "typeByName",
+                                    "modified",
+                                    "framesAreStated",
+                                    "stereoPartner",
+                                    "stereoPartnerExists",
+                                    "error"};
+
+Record recordOf(const std::string& path, const Description& description)
 {
     const auto& [info, facts, md5, sha256] = description;
-    json.beginObject();
-    json.member("path", path);
-    json.member("container", fourCCText(info.containerId));
-    json.member("containerName", containerWord(info));
-    json.member("fileType", fourCCText(info.fileType));
-    json.member("formatCode", fourCCText(info.formatCode));
-    json.member("coding", codingWord(info));
-    json.knownMember("sampleRate", positive(info.sampleRate));
-    json.knownMember("bitsPerSample", positive(info.bitsPerSample));
-    json.knownMember("sourceBits", positive(info.sourceBits));
+    Record record;
+    record.member("path", path);
+    record.member("container", fourCCText(info.containerId));
+    record.member("containerName", containerWord(info));
+    record.member("fileType", fourCCText(info.fileType));
+    record.member("formatCode", fourCCText(info.formatCode));
+    record.member("coding", codingWord(info));
+    record.knownMember("sampleRate", positive(info.sampleRate));
+    record.knownMember("bitsPerSample", positive(info.bitsPerSample));
+    record.knownMember("sourceBits", positive(info.sourceBits));
     if (!info.compressed)
-        json.member("floatingPoint", info.floatingPoint);
-    json.knownMember("bitRate", positive(bitRateOf(info)));
-    json.knownMember("dsdRate", positive(info.dsdRate));
-    json.member("channels", info.channels);
-    json.knownMember("channelLayout", layoutWord(info));
+        record.member("floatingPoint", info.floatingPoint);
+    record.knownMember("bitRate", positive(bitRateOf(info)));
+    record.knownMember("dsdRate", positive(info.dsdRate));
+    record.member("channels", info.channels);
+    record.knownMember("channelLayout", layoutWord(info));
     if (info.audioTracks > 1)
-        json.member("audioTracks", info.audioTracks);
-    json.member("frames", info.frames);
+        record.member("audioTracks", info.audioTracks);
+    record.member("frames", info.frames);
     if (info.exactSampleRate > 0)
-        json.member("durationSeconds", durationOf(info));
-    json.member("isWhole", info.IsWhole());
-    json.knownMember("missingBytes", positive(info.missingDataSize));
-    json.knownMember("promisedFrames", positive(promisedFrames(info)));
-    json.knownMember("md5", md5);
-    json.knownMember("sha256", sha256);
-    json.knownMember("dataOffset", positive(info.dataOffset));
-    json.member("fileLength", info.fileLength);
-    json.knownMember("typeByName", typeByNameText(facts));
-    json.knownMember("modified", dateText(facts.modified));
+        record.member("durationSeconds", durationOf(info));
+    record.member("isWhole", info.IsWhole());
+    record.knownMember("missingBytes", positive(info.missingDataSize));
+    record.knownMember("promisedFrames", positive(promisedFrames(info)));
+    record.knownMember("md5", md5);
+    record.knownMember("sha256", sha256);
+    record.knownMember("dataOffset", positive(info.dataOffset));
+    record.member("fileLength", info.fileLength);
+    record.knownMember("typeByName", typeByNameText(facts));
+    record.knownMember("modified", dateText(facts.modified));
     if (info.framesAreStated)
-        json.member("framesAreStated", true); // no decoder could count them
+        record.member("framesAreStated", true); // no decoder could count them
     if (facts.stereo) {
-        json.member("stereoPartner", shownName(facts.stereo->partner));
-        json.member("stereoPartnerExists", facts.stereo->partnerExists);
+        record.member("stereoPartner", shownName(facts.stereo->partner));
+        record.member("stereoPartnerExists", facts.stereo->partnerExists);
     }
-    json.endObject();
+    return record;
 }
 
 std::vector<Table::Column> columns(const InfoOptions& wanted)
@@ -184,17 +221,16 @@ public:
         : form_(outputForm(options)),
           color_(usesColor(options.color)),
           wanted_(wanted),
-          json_(options)
+          records_(options, kColumns)
     {
     }
 
-    bool needsFacts() const { return form_ == Form::json || wanted_.isLong; }
+    bool needsFacts() const { return isData() || wanted_.isLong; }
 
     void add(const std::string& path, const Description& description)
     {
-        if (form_ == Form::json) {
-            writeJson(json_.begin(), path, description);
-            json_.end();
+        if (isData()) {
+            records_.add(recordOf(path, description));
         } else if (form_ == Form::table) {
             addRow(path, description);
         } else if (form_ == Form::lines) {
@@ -202,15 +238,16 @@ public:
         }
     }
 
-    void addFailure(const std::string& path, const std::string& text) { json_.addFailure(path, text); }
+    void addFailure(const std::string& path, const std::string& text) { records_.addFailure(path, text); }
 
     void finish()
     {
-        json_.finish();
+        records_.finish();
         table_.print(output_, color_);
     }
 
 private:
+    bool isData() const { return form_ == Form::json || form_ == Form::csv; }
     void addRow(const std::string& path, const Description& description)
     {
         const auto& [info, facts, md5, sha256] = description;
@@ -253,7 +290,7 @@ private:
     bool color_;
     InfoOptions wanted_;
     Output& output_ = Output::standard();
-    JsonRecords json_;
+    DataRecords records_;
     Table table_{columns(wanted_)};
 };
 
@@ -279,6 +316,7 @@ void declareInfo(CommandLine& commandLine)
     Verb& verb = commandLine.addVerb("info", "Say what audio files are: length, rate, format, channels",
                                      [&commandLine] { return runInfo(files, wanted, commandLine.output()); });
     CommandLine::addFilesOrInput(verb, files);
+    commandLine.addCsv(verb);
     addThreads(verb, wanted.threads);
     const Argument isLong = verb.addFlag(
         "-l,--long", wanted.isLong,

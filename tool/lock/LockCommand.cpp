@@ -148,6 +148,7 @@ void sayHeld(const LockArguments& arguments, const OutputOptions& options)
     case Form::lines:
         output.print("{}\t{}\theld\n", printable(shownName(arguments.file)), arguments.kind());
         break;
+    case Form::csv: // which this verb has not
     case Form::none:
         break;
     }

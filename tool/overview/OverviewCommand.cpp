@@ -147,7 +147,7 @@ Reading readFile(const std::string& path, const Task& task)
     const FileVersion version = versionOf(path);
     if (arguments.store)
         requireRoomForOverview(path);
-    const bool showsProgress = !arguments.edit.quiet && !arguments.files.maybeSeveral();
+    const bool showsProgress = !arguments.edit.quiet;
     if (arguments.fromStored) {
         Reading reading{FileOverview::stored(path), version};
         if (arguments.draws())

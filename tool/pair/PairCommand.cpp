@@ -2,7 +2,7 @@
 #include "tool/shared/arguments/CommandLine.h"
 #include "tool/shared/input/FileByFile.h"
 #include "tool/shared/input/FileFacts.h"
-#include "tool/shared/output/JsonRecords.h"
+#include "tool/shared/output/DataRecords.h"
 #include "tool/shared/output/Table.h"
 
 #include <set>
@@ -19,22 +19,23 @@ const char* stateOf(const Pair& pair)
     return pair.hasLeft && pair.hasRight ? "pair" : pair.hasLeft ? "right missing" : "left missing";
 }
 
+constexpr const char* kColumns[] = {"left", "right", "leftExists", "rightExists", "path", "error"};
+
 class PairWriter {
 public:
     explicit PairWriter(const OutputOptions& options)
         : form_(outputForm(options)),
           color_(usesColor(options.color)),
-          json_(options)
+          records_(options, kColumns)
     {
     }
 
     void add(const Pair& pair)
     {
-        if (form_ == Form::json) {
-            JsonWriter& json = json_.begin();
-            json.beginObject().member("left", pair.left).member("right", pair.right);
-            json.member("leftExists", pair.hasLeft).member("rightExists", pair.hasRight).endObject();
-            json_.end();
+        if (form_ == Form::json || form_ == Form::csv) {
+            Record record;
+            record.member("left", pair.left).member("right", pair.right);
+            records_.add(record.member("leftExists", pair.hasLeft).member("rightExists", pair.hasRight));
         } else if (form_ == Form::table) {
             table_.add({printable(pair.left), printable(pair.right), stateOf(pair)});
         } else if (form_ == Form::lines) {
@@ -42,11 +43,11 @@ public:
         }
     }
 
-    void addFailure(const std::string& path, const std::string& text) { json_.addFailure(path, text); }
+    void addFailure(const std::string& path, const std::string& text) { records_.addFailure(path, text); }
 
     void finish()
     {
-        json_.finish();
+        records_.finish();
         table_.print(output_, color_);
     }
 
@@ -54,7 +55,7 @@ private:
     Form form_;
     bool color_;
     Output& output_ = Output::standard();
-    JsonRecords json_;
+    DataRecords records_;
     Table table_{{{.title = "LEFT", .isCuttable = true}, {.title = "RIGHT", .isCuttable = true}, {.title = "STATE"}}};
 };
 
@@ -85,6 +86,7 @@ void declarePair(CommandLine& commandLine)
     Verb& verb = commandLine.addVerb("pair", "List stereo pairs of mono files, and halves without their partner",
                                      [&commandLine] { return runPair(files, commandLine.output()); });
     CommandLine::addFiles(verb, files).describe("The files, and folders of them");
+    commandLine.addCsv(verb);
 }
 
 const VerbRegistration registration{15, declarePair};

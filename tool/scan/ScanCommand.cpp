@@ -6,6 +6,7 @@
 #include "tool/shared/looptags/LoopTags.h"
 #include "tool/shared/output/Failure.h"
 #include "tool/shared/output/FilesProgress.h"
+#include "tool/shared/output/ProgressLine.h"
 #include "tool/shared/threads/OrderedWork.h"
 
 #include <algorithm>
@@ -23,7 +24,6 @@ using ScanWork = OrderedWork<Batch, Records>;
 
 struct ScanArguments {
     FileArguments folders;
-    bool csv = false;
     unsigned threads = 0;
 };
 
@@ -68,8 +68,6 @@ public:
         const bool sharesTerminal = progress_.isActive() && isTerminal(STDOUT_FILENO);
         const bool prints = std::any_of(records.begin(), records.end(),
                                         [](const ScanRecord& record) { return record.kind == ScanRecord::loop; });
-        if (sharesTerminal && prints)
-            progress_.hide();
         files_ += std::ssize(records);
         for (ScanRecord& record : records)
             if (record.kind != ScanRecord::none) {
@@ -129,13 +127,18 @@ void scanByThreads(const std::vector<std::string>& folders, unsigned threads,
 
 bool runScan(const ScanArguments& arguments, const OutputOptions& options)
 {
-    if (arguments.csv && options.wantsJson())
-        throw UsageError("--csv and JSON exclude each other");
-    std::vector<std::string> folders;
-    if (!reportingRecord(arguments.folders.listName(), options, [&] { folders = allNames(arguments.folders); }))
-        return false;
-    const ScanForm form = arguments.csv ? ScanForm::csv : scanForm(outputForm(options));
+    const Form form = outputForm(options);
     ScanWriter writer(form, options);
+    std::vector<std::string> folders;
+    const std::string list = arguments.folders.listName();
+    try {
+        folders = allNames(arguments.folders);
+    } catch (const Failure& failure) {
+        writer.add({ScanRecord::bad, list, failure.what(), {}});
+        writer.finish();
+        reportFailure(list, failure.what());
+        return false;
+    }
     FilesProgress progress("scanning", options.quiet);
     ResultWriter results(writer, progress);
     {
@@ -144,7 +147,8 @@ bool runScan(const ScanArguments& arguments, const OutputOptions& options)
             counter = startedThread([&](const std::stop_token& stop) { countInto(progress, folders, stop); });
         scanByThreads(
             folders, threadsFor(arguments.threads),
-            [form](const Batch& batch) {
+            [form, &progress](const Batch& batch) {
+                progress.begin(batch.front().path);
                 Records records;
                 for (const FoundFile& file : batch)
                     records.push_back(scanFile(file, form));
@@ -152,12 +156,12 @@ bool runScan(const ScanArguments& arguments, const OutputOptions& options)
             },
             results);
     }
-    progress.hide();
     writer.finish();
     Output::standard().flush(); // ahead of what follows on standard error
     for (const BadFile& file : results.bad())
         reportFailure(file.path, file.problem);
     // For who watches: records go to standard output alone, and scripts that keep both find problems only.
+    const progressline::Cleared cleared;
     if (!options.quiet && isTerminal(STDERR_FILENO) && !Output::standard().failed())
         fmt::print(stderr, "{}\n", results.count());
     return results.bad().empty();
@@ -169,7 +173,7 @@ void declareScan(CommandLine& commandLine)
     Verb& verb = commandLine.addVerb("scan", "List the loops below folders, with their tags",
                                      [&commandLine] { return runScan(arguments, commandLine.output()); });
     CommandLine::addFiles(verb, arguments.folders, "FOLDER").describe("The folders");
-    verb.addFlag("--csv", arguments.csv, "Print comma-separated values (RFC 4180), with a header");
+    commandLine.addCsv(verb);
     addThreads(verb, arguments.threads);
 }
 

@@ -2,14 +2,12 @@
 #pragma once
 
 #include "tool/shared/input/FoundFile.h"
+#include "tool/shared/output/CsvRecords.h"
 #include "tool/shared/output/JsonRecords.h"
 #include "tool/shared/output/Table.h"
 
 #include <string>
 #include <vector>
-
-enum class ScanForm { table, lines, json, csv, none };
-ScanForm scanForm(Form form);
 
 struct ScanRecord {
     enum Kind { none, loop, bad };
@@ -22,22 +20,22 @@ struct ScanRecord {
 /// Reads one file. A loop is an AIFF or CAF file that has loop tags, transients or another loop chunk, and one of
 /// these, AIFC or WAVE that other programs' chunks call a loop (SamplerTags::describeLoop). Bad is what cannot be read,
 /// but of the files that hold no known audio, and of links to nothing, only those that are called so (".wav", ".aif",
-/// ".aiff",
-/// ".aifc", ".caf"). Throws nothing.
-ScanRecord scanFile(const FoundFile& file, ScanForm form);
+/// ".aiff", ".aifc", ".caf"). Throws nothing.
+ScanRecord scanFile(const FoundFile& file, Form form);
 
-/// Writes the records of the loops, and in JSON those of bad files.
+/// Writes the records of the loops, and in JSON and CSV those of bad files.
 class ScanWriter {
 public:
-    ScanWriter(ScanForm form, const OutputOptions& options);
+    ScanWriter(Form form, const OutputOptions& options);
     void add(const ScanRecord& record);
     void finish();
 
 private:
-    ScanForm form_;
+    Form form_;
     bool color_;
     bool first_ = true;
     Table table_;
     Output& output_ = Output::standard();
     JsonRecords json_;
+    CsvRecords csv_;
 };

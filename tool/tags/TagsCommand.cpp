@@ -5,6 +5,8 @@
 #include "tool/shared/arguments/ThreadsOption.h"
 #include "tool/shared/input/FileByFile.h"
 #include "tool/shared/looptags/LoopTags.h"
+#include "tool/shared/looptags/LoopTagsCsv.h"
+#include "tool/shared/output/DisplayWidth.h"
 #include "tool/shared/output/Failure.h"
 #include "tool/shared/output/JsonRecords.h"
 
@@ -18,7 +20,8 @@ public:
         : form_(outputForm(options)),
           color_(usesColor(options.color)),
           several_(several),
-          json_(options)
+          json_(options),
+          csv_(options, loopColumns())
     {
     }
 
@@ -27,6 +30,8 @@ public:
         if (form_ == Form::json) {
             writeLoopTags(json_.begin(), path, tags);
             json_.end();
+        } else if (form_ == Form::csv) {
+            csv_.addRow(loopRow(path, tags));
         } else if (form_ == Form::table) {
             addTable(path, tags);
         } else if (form_ == Form::lines) {
@@ -37,21 +42,32 @@ public:
         first_ = false;
     }
 
-    void addFailure(const std::string& path, const std::string& text) { json_.addFailure(path, text); }
+    void addFailure(const std::string& path, const std::string& text)
+    {
+        json_.addFailure(path, text);
+        csv_.addFailure(path, text);
+    }
 
-    void finish() { json_.finish(); }
+    void finish()
+    {
+        json_.finish();
+        csv_.finish();
+    }
 
 private:
     void addTable(const std::string& path, const LoopTags& tags)
     {
-        constexpr int kLabelWidth = 12;
+        constexpr int kLabelWidth = 12, kIndent = kLabelWidth + 4;
         output_.print("{}{}{}{}  {}\n", first_ ? "" : "\n", color_ ? "\x1b[1m" : "", printable(path),
                       color_ ? "\x1b[0m" : "", loopContainerName(tags.fileType));
         const auto lines = tagLines(tags);
-        for (const TagLine& line : lines)
-            output_.print("  {:<{}}  {}{}{}\n", line.label, kLabelWidth, line.brief,
-                          line.name == std::string_view("tempo") ? " BPM" : "",
-                          line.source.empty() ? "" : fmt::format("  [{}]", line.source));
+        for (const TagLine& line : lines) {
+            const bool isTempo = line.name == std::string_view("tempo");
+            const std::string text = fmt::format("{}{}{}", line.brief, isTempo ? " BPM" : "",
+                                                 line.source.empty() ? "" : fmt::format("  [{}]", line.source));
+            output_.print("  {:<{}}  {}\n", line.label, kLabelWidth,
+                          columns_ ? wrapped(text, *columns_, kIndent, kIndent) : text);
+        }
         if (lines.empty())
             output_.print("  no loop tags\n");
     }
@@ -60,8 +76,10 @@ private:
     bool color_;
     bool several_;
     bool first_ = true;
+    std::optional<int> columns_ = columnsOfOutput();
     Output& output_ = Output::standard();
     JsonRecords json_;
+    CsvRecords csv_;
 };
 
 bool runTags(const FileArguments& files, unsigned threads, const OutputOptions& options)
@@ -81,6 +99,7 @@ void declareTags(CommandLine& commandLine)
     Verb& verb = commandLine.addVerb("tags", "Show the loop tags of AIFF and CAF files; set, remove or copy some",
                                      [&commandLine] { return runTags(files, threads, commandLine.output()); });
     CommandLine::addFilesOrInput(verb, files);
+    commandLine.addCsv(verb);
     addThreads(verb, threads);
     declareTagsSet(commandLine, verb);
     declareTagsRemove(commandLine, verb);

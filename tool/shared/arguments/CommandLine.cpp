@@ -169,6 +169,11 @@ void CommandLine::addFileList(Verb& verb, FileArguments& files)
     verb.addFlag("-0,--null", files.isNulSeparated, "A NUL byte ends each name in LIST, not the line");
 }
 
+Argument CommandLine::addCsv(Verb& verb)
+{
+    return verb.addFlag("--csv", output_.csv, "Print comma-separated values (RFC 4180), with a header");
+}
+
 Argument CommandLine::addChunkId(Verb& verb, FourCC& id)
 {
     const auto take = [&id](const std::string& text) { id = chunkIdFromText(text).value_or(0); };
@@ -234,6 +239,8 @@ int CommandLine::parseAndRun(const std::vector<std::string>& arguments)
             std::fputs(program_.help().c_str(), stderr);
             return kExitUsage;
         }
+        if (output_.csv && output_.wantsJson())
+            throw UsageError("--csv and JSON exclude each other");
         Output::standard().write(text);
         return verb == nullptr || verb->work() ? kExitOK : failureStatus_;
     } catch (const UsageError& error) {

@@ -35,6 +35,8 @@ public:
     /// Also "-", for standard input.
     static Argument addFilesOrInput(Verb& verb, FileArguments& files);
     static void addFileList(Verb& verb, FileArguments& files);
+    /// "--csv", of verbs whose records are flat.
+    Argument addCsv(Verb& verb);
     static Argument addChunkId(Verb& verb, FourCC& id);
     /// An option whose value names a file; "-" stands for standard input or output.
     static Argument addPath(Verb& verb, const std::string& name, std::string& path, const std::string& description);

@@ -2,6 +2,7 @@
 
 #include "files/CTemporaryFile.h"
 #include "platform/SignalHold.h"
+#include "tool/shared/output/ProgressLine.h"
 
 #include <atomic>
 #include <csignal>
@@ -26,6 +27,7 @@ void awaitThoseBeingMade()
 
 extern "C" void removeTemporaryFiles(int signal)
 {
+    progressline::clearFromSignalHandler();
     awaitThoseBeingMade();
     CTemporaryFile::RemoveAllFromSignalHandler();
     ::signal(signal, SIG_DFL);

@@ -36,7 +36,7 @@ SafeEdit::SafeEdit(const std::string& path, const EditOptions& options) : given_
                                                .keepTimes = options.keepTimes,
                                                .backup = options.backup,
                                                .waitForLock = wait,
-                                               .progress = copyProgress("copying", options.quiet)});
+                                               .progress = copyProgress(path, options.quiet)});
     problem.name = asGiven(problem.name, path);
     requireNone(problem);
 }

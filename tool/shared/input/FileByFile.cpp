@@ -23,6 +23,7 @@ struct Answer {
     FoundFile file;
     FileRest rest;
     std::exception_ptr problem;
+    double parts = 0; // of the work that progress has heard of
 };
 
 class FileWork {
@@ -40,15 +41,15 @@ public:
         std::jthread counter;
         if (maybeSeveral && progress_.isActive())
             counter = startedThread([this, &walk](const std::stop_token& stop) { count(walk, stop); });
+        else if (!maybeSeveral)
+            progress_.setTotal(1);
         const unsigned threads = maybeSeveral ? threadsFor(loop_.threads) : 1;
         if (threads == 1 || !runByThreads(walk, threads))
             walk([this](FoundFile file) { return take(answerFor(file)); });
-        progress_.hide();
     }
     void fail(const std::string& path, const std::string& text)
     {
         note(path, text);
-        progress_.hide();
         Output::standard().flush(); // what was told so far comes first
         reportFailure(path, text);
     }
@@ -91,8 +92,9 @@ private:
         if (!stop.stop_requested())
             progress_.setTotal(files);
     }
-    Answer answerFor(const FoundFile& file) const
+    Answer answerFor(const FoundFile& file)
     {
+        progress_.begin(file.path);
         Answer answer{file, {}, {}};
         try {
             if (!file.problem.empty())
@@ -101,13 +103,12 @@ private:
         } catch (...) {
             answer.problem = std::current_exception();
         }
+        answer.parts = FilesProgress::takeParts();
         return answer;
     }
     bool take(Answer answer)
     {
         const std::string& path = answer.file.path;
-        if (sharesTerminal_)
-            progress_.hide();
         try {
             if (answer.problem)
                 std::rethrow_exception(answer.problem);
@@ -121,7 +122,7 @@ private:
         }
         if (sharesTerminal_)
             Output::standard().flush(); // ahead of the next line of progress
-        progress_.advance(1);
+        progress_.advance(1, answer.parts + FilesProgress::takeParts());
         return !Output::standard().failed();
     }
     void note(const std::string& path, const std::string& text)

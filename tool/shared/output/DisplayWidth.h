@@ -4,7 +4,8 @@
 #include <string>
 #include <string_view>
 
-/// The next character of UTF-8, by which `text` is shortened; U+FFFD for a byte that begins none.
+/// The next character of UTF-8, by which `text` is shortened; U+FFFD for a byte that begins none, and for the beginning
+/// of one that is not whole (The Unicode Standard, table 3-7, and section 3.9 on maximal subparts).
 char32_t takeCharacter(std::string_view& text);
 
 /// Whether a terminal shows something for the character, or combines it with the one before: no control, no separator

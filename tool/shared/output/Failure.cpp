@@ -1,6 +1,7 @@
 #include "tool/shared/output/Failure.h"
 
 #include "platform/core/Status.h"
+#include "tool/shared/output/ProgressLine.h"
 #include "tool/shared/output/ShownName.h"
 #include "tool/shared/output/UnseenCharacters.h"
 
@@ -24,6 +25,7 @@ void requireOK(std::int32_t status)
 
 void reportFailure(const std::string& path, const std::string& text)
 {
+    const progressline::Cleared cleared;
     // Not by fmt::print, which throws where standard error cannot be written: the work is not to end for that.
     std::fputs(
         fmt::format("ktfiles: {}: {}\n", printableOnError(shownName(path)), printableOnError(shownName(text))).c_str(),

@@ -1,38 +1,12 @@
 #include "tool/shared/output/JsonWriter.h"
 
 #include "tool/shared/output/ClockTime.h"
+#include "tool/shared/output/DisplayWidth.h"
 #include "tool/shared/output/UnseenCharacters.h"
 
 #include <algorithm>
 
 namespace {
-
-struct Character {
-    char32_t code;
-    std::size_t length; // of its bytes
-};
-
-// The first character of UTF-8; U+FFFD for a byte that begins none, and for the beginning of one that is not whole (The
-// Unicode Standard, table 3-7, and section 3.9 on maximal subparts).
-Character firstCharacter(std::string_view text)
-{
-    const auto byteAt = [text](std::size_t i) { return static_cast<unsigned char>(text[i]); };
-    const unsigned lead = byteAt(0);
-    if (lead < 0x80)
-        return {lead, 1};
-    if (lead < 0xC2 || lead > 0xF4)
-        return {0xFFFD, 1};
-    const std::size_t length = lead < 0xE0 ? 2 : lead < 0xF0 ? 3 : 4;
-    char32_t code = lead & (0x7FU >> length);
-    for (std::size_t i = 1; i < length; ++i) {
-        const unsigned least = i > 1 ? 0x80 : lead == 0xE0 ? 0xA0 : lead == 0xF0 ? 0x90 : 0x80;
-        const unsigned most = i > 1 ? 0xBF : lead == 0xED ? 0x9F : lead == 0xF4 ? 0x8F : 0xBF;
-        if (i == text.size() || byteAt(i) < least || byteAt(i) > most)
-            return {0xFFFD, i};
-        code = code << 6 | (byteAt(i) & 0x3FU);
-    }
-    return {code, length};
-}
 
 std::string base64(const Bytes& bytes)
 {
@@ -69,10 +43,10 @@ void JsonWriter::putEscaped(std::string_view text)
 {
     constexpr std::string_view kEscaped = "\"\\\b\f\n\r\t", kLetters = "\"\\bfnrt";
     while (!text.empty()) {
-        const auto [code, length] = firstCharacter(text);
-        const std::string_view bytes = text.substr(0, length);
-        text.remove_prefix(length);
-        if (const std::size_t found = length == 1 ? kEscaped.find(bytes[0]) : kEscaped.npos; found != kEscaped.npos) {
+        std::string_view bytes = text;
+        const char32_t code = takeCharacter(text);
+        bytes.remove_suffix(text.size());
+        if (const std::size_t found = kEscaped.find(bytes); found != kEscaped.npos) {
             put('\\');
             put(kLetters[found]);
         } else if (code >= 0x20 && !isLateControl(code) && !isUnseen(code)) {

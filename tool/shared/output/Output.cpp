@@ -1,6 +1,7 @@
 #include "tool/shared/output/Output.h"
 
 #include "tool/shared/output/Failure.h"
+#include "tool/shared/output/ProgressLine.h"
 
 #include <cerrno>
 #include <poll.h>
@@ -10,6 +11,8 @@ Form outputForm(const OutputOptions& options)
 {
     if (options.wantsJson())
         return Form::json;
+    if (options.csv)
+        return Form::csv;
     if (options.quiet)
         return Form::none;
     return isTerminal(STDOUT_FILENO) || options.color == ColorMode::always ? Form::table : Form::lines;
@@ -40,6 +43,10 @@ bool Output::flush()
 
 void Output::writeThrough(std::string_view bytes)
 {
+    static const bool onTerminal = isTerminal(STDOUT_FILENO);
+    std::optional<progressline::Cleared> cleared;
+    if (onTerminal && !bytes.empty())
+        cleared.emplace();
     while (!bytes.empty() && !failed()) {
         const ssize_t written = ::write(STDOUT_FILENO, bytes.data(), bytes.size());
         if (written >= 0) {

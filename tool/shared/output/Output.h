@@ -12,19 +12,20 @@
 /// What is asked for with --json and --jsonl.
 enum class JsonShape { none, array, lines };
 
-/// The options that every verb takes.
+/// The options that every verb takes, and that of CSV.
 struct OutputOptions {
     JsonShape json = JsonShape::none;
+    bool csv = false; // of verbs that have it; never beside JSON
     bool quiet = false;
     ColorMode color = ColorMode::automatic;
 
     bool wantsJson() const { return json != JsonShape::none; }
 };
 
-/// How results are written: for people, for scripts by line or as JSON, or not at all.
-enum class Form { table, lines, json, none };
+/// How results are written: for people, for scripts by line, as JSON or as CSV, or not at all.
+enum class Form { table, lines, json, csv, none };
 
-/// JSON where asked for; else nothing when quiet; else a table on a terminal and wherever colour is demanded.
+/// JSON or CSV where asked for; else nothing when quiet; else a table on a terminal and wherever colour is demanded.
 Form outputForm(const OutputOptions& options);
 
 /// The one writer to standard output. After a failed write (a full disk, a closed pipe) the rest is dropped.

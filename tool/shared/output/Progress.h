@@ -1,33 +1,29 @@
-// A progress bar on standard error, for work that lasts.
+// The progress of work on one file, by bytes or frames.
 #pragma once
 
-#include <chrono>
+#include "tool/shared/output/FilesProgress.h"
+
 #include <cstdint>
 #include <functional>
+#include <optional>
 #include <string>
 
-/// Shows itself after a second, on a terminal only, and is gone when it is destroyed.
+/// A part of the work on many files where these have a line of progress, else a line of its own.
 class Progress {
 public:
-    /// `total` bytes of work; `label` says which.
-    Progress(std::string label, std::int64_t total, bool quiet);
+    /// `total` bytes of work; `doing` says what is done with the file. Both it and `path` are for a line of its own.
+    Progress(std::string doing, std::int64_t total, bool quiet, const std::string& path = {});
     Progress(const Progress&) = delete;
     Progress& operator=(const Progress&) = delete;
-    ~Progress();
 
     void advance(std::int64_t bytes);
 
 private:
-    using Clock = std::chrono::steady_clock;
-    void draw() const;
-
-    std::string label_;
+    std::optional<FilesProgress> own_;
+    FilesProgress* line_;
     std::int64_t total_;
     std::int64_t done_ = 0;
-    bool active_;
-    bool shown_ = false;
-    Clock::time_point nextDraw_;
 };
 
-/// A bar for each copy that the library tells of, which is gone when the copy is made.
-std::function<void(std::int64_t done, std::int64_t all)> copyProgress(std::string label, bool quiet);
+/// The progress of each copy that the library tells of.
+std::function<void(std::int64_t done, std::int64_t all)> copyProgress(std::string path, bool quiet);

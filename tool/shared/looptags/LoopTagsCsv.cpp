@@ -1,0 +1,29 @@
+#include "tool/shared/looptags/LoopTagsCsv.h"
+
+namespace {
+
+constexpr const char* kColumns[] = {
+    "path",         "fileType",        "containerName", "sampleRate",   "frames",         "durationSeconds",
+    "tempo",        "beatCount",       "midiRootNote",  "key",          "keyType",        "mode",
+    "signatureTop", "signatureBottom", "signature",     "loopFileType", "instrumentType", "instrumentSubType",
+    "genre",        "descriptors",     "title",         "artist",       "copyright",      "comments",
+    "transients",   "chunks",          "error"};
+
+} // namespace
+
+CsvColumns loopColumns()
+{
+    return kColumns;
+}
+
+std::string loopRow(const std::string& path, const LoopTags& tags)
+{
+    Record record;
+    record.member("path", path);
+    for (const TagValue& tag : tagRecord(tags))
+        record.member(tag.name, tag.value);
+    platform::Array ids;
+    for (const LoopTags::Chunk& chunk : tags.chunks)
+        ids.emplace_back(chunk.id);
+    return csvRow(kColumns, record.member("transients", tags.transients.size()).member("chunks", ids));
+}

@@ -1,0 +1,46 @@
+// What a verb tells of one file as data: values by their names, for JSON and CSV alike.
+#pragma once
+
+#include "platform/core/Value.h"
+#include "tool/shared/output/JsonWriter.h"
+
+#include <optional>
+#include <string>
+#include <utility>
+#include <vector>
+
+class Record {
+public:
+    struct Field {
+        std::string name;
+        platform::Value value;
+    };
+
+    Record& member(std::string name, platform::Value value)
+    {
+        fields_.push_back({std::move(name), std::move(value)});
+        return *this;
+    }
+    // What is not known has no name:
+
+    template <class T>
+    Record& knownMember(std::string name, const std::optional<T>& value)
+    {
+        return value ? member(std::move(name), *value) : *this;
+    }
+    Record& knownMember(std::string name, const std::string& text)
+    {
+        return text.empty() ? *this : member(std::move(name), text);
+    }
+
+    /// Into an object that has begun.
+    void write(JsonWriter& json) const
+    {
+        for (const Field& field : fields_)
+            json.member(field.name, field.value);
+    }
+    const std::vector<Field>& fields() const { return fields_; }
+
+private:
+    std::vector<Field> fields_;
+};

@@ -4,15 +4,22 @@ import io
 import json
 import os
 import shutil
+import struct
 import unittest
 
-from command import MEDIA, CommandTest, wave
+from command import MEDIA, CommandTest, chunk, wave
 
 NASTY = 'comma, "quoted"\nline\r=1+1 é\u202e'
 
 
-def flat(value):
+def flat(value, name=None):
     """A cell as a reader of CSV gets it."""
+    if name in ("transients", "markers"):
+        return str(len(value))
+    if name == "loops":
+        return ",".join(f"{loop['firstFrame']}-{loop['lastFrame']}" for loop in value)
+    if isinstance(value, dict):
+        return ",".join(f"{key}={source}" for key, source in value.items())
     if isinstance(value, list):
         return ",".join(flat(item["id"] if isinstance(item, dict) else item) for item in value)
     return json.dumps(value) if isinstance(value, (bool, int, float)) else value
@@ -24,6 +31,8 @@ class CSV(CommandTest):
         shutil.copytree(MEDIA, self.folder / "media")
         lib = self.folder / "lib"
         lib.mkdir()
+        smpl = struct.pack("<9I6I", 0, 0, 0, 57, 0, 0, 0, 1, 0, 0, 0, 10, 90, 0, 0)
+        (lib / "sampler.wav").write_bytes(wave(chunk(b"smpl", smpl), chunk(b"cue ", struct.pack("<7I", 1, 1, 5, 0x61746164, 0, 0, 5))))
         for name in (NASTY + ".L.aiff", "=cmd|' C calc'!A0.aiff"):
             shutil.copy(MEDIA / "bassline.aiff", lib / name)
         self.run_command("tags", "set", "lib/=cmd|' C calc'!A0.aiff", "-q", "title=" + 'say "so", 中\n+1', "beatCount=3")
@@ -46,9 +55,9 @@ class CSV(CommandTest):
                           ["scan", "media", "lib", "gone"], ["pair", "media", "lib", "gone.L.wav"]):
             found = json.loads(self.run_command(arguments[0], "--json", *arguments[1:], status=None).stdout)
             header, rows = self.rows(*arguments, status=None)
-            counted = [{name: str(len(value)) if name == "transients" else flat(value) for name, value in item.items()} for item in found]
+            counted = [{name: flat(value, name) for name, value in item.items()} for item in found]
             if arguments[0] in ("tags", "scan"):
-                counted = [item if "error" in item else {"transients": "0", **item} for item in counted]
+                counted = [item if "error" in item else {"transients": "0", "markers": "0", **item} for item in counted]
             self.assertEqual([{name: value for name, value in item.items() if value != ""} for item in counted], rows, arguments[0])
             self.assertGreater(len(rows), 3 if arguments[0] != "pair" else 0)
             self.assertEqual(self.rows(arguments[0], "media/bassline.aiff", status=None)[0], header)

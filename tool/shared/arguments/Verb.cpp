@@ -1,6 +1,8 @@
 #include "tool/shared/arguments/Verb.h"
 
 #include "tool/shared/arguments/UsageError.h"
+#include "tool/shared/output/DisplayWidth.h"
+#include "tool/shared/output/Terminal.h"
 
 #include <CLI/CLI.hpp>
 
@@ -38,7 +40,7 @@ public:
     HelpFormatter()
     {
         label("Positionals", "Arguments");
-        column_width(26);
+        column_width(kNameColumns);
     }
 
     std::string make_usage(const CLI::App* app, std::string name) const override
@@ -55,7 +57,15 @@ public:
         std::string help = CLI::Formatter::make_help(app, std::move(name), mode);
         if (const std::size_t gap = help.find("\n\n\n"); gap != help.npos)
             help.erase(gap, 1); // the group of words lists nothing, and has an empty line in front all the same
-        return help;
+        return fitted(help);
+    }
+
+    std::string make_option_name(const CLI::Option* option, bool isPositional) const override
+    {
+        std::string names = CLI::Formatter::make_option_name(option, isPositional);
+        if (const std::size_t comma = names.find(','); comma != names.npos)
+            names.insert(comma + 1, " ");
+        return names;
     }
 
     /// What an option goes with is in its description.
@@ -66,6 +76,22 @@ public:
     }
 
 private:
+    static constexpr int kNameColumns = 26, kMostColumns = 100; // longer lines are hard to read
+
+    static std::string fitted(std::string_view help)
+    {
+        const int columns = std::min(terminalColumns(), kMostColumns);
+        std::string result;
+        while (!help.empty()) {
+            const std::size_t end = std::min(help.find('\n'), help.size());
+            const std::string_view line = help.substr(0, end);
+            const bool isListed = line.starts_with("  "), isUsage = line.find(" [options]") != line.npos;
+            result += wrapped(line, columns, 0, isUsage ? 11 : isListed ? kNameColumns : 0) + '\n';
+            help.remove_prefix(std::min(end + 1, help.size()));
+        }
+        return result;
+    }
+
     static std::string usageLine(const CLI::App& app, const std::string& name)
     {
         std::string line = name;
@@ -186,7 +212,7 @@ Verb::Request Verb::parse(const std::vector<std::string>& arguments)
     try {
         app_->parse(std::move(reversed));
     } catch (const CLI::CallForHelp&) {
-        return {nullptr, help()};
+        return {nullptr, app_->help()}; // of the verb that the arguments name
     } catch (const CLI::CallForVersion& version) {
         return {nullptr, version.what() + std::string("\n")};
     } catch (const CLI::ParseError& error) {
@@ -224,5 +250,7 @@ const Verb* Verb::find(const std::string& name) const
 
 std::string Verb::help(const std::string& above) const
 {
-    return app_->help(above);
+    // Not by the parser's own, which gives that of a verb in the arguments: of "help" itself.
+    const std::string name = above.empty() ? app_->get_name() : above + " " + app_->get_name();
+    return app_->get_formatter()->make_help(app_.get(), name, CLI::AppFormatMode::Normal);
 }

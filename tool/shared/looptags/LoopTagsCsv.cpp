@@ -7,7 +7,7 @@ constexpr const char* kColumns[] = {
     "tempo",        "beatCount",       "midiRootNote",  "key",          "keyType",        "mode",
     "signatureTop", "signatureBottom", "signature",     "loopFileType", "instrumentType", "instrumentSubType",
     "genre",        "descriptors",     "title",         "artist",       "copyright",      "comments",
-    "transients",   "chunks",          "error"};
+    "sources",      "loops",           "markers",       "transients",   "chunks",         "error"};
 
 } // namespace
 
@@ -22,8 +22,13 @@ std::string loopRow(const std::string& path, const LoopTags& tags)
     record.member("path", path);
     for (const TagValue& tag : tagRecord(tags))
         record.member(tag.name, tag.value);
-    platform::Array ids;
+    platform::Array sources, loops, ids;
+    for (const auto& [name, chunk] : tags.sources)
+        sources.emplace_back(fmt::format("{}={}", name, chunk));
+    for (const auto& loop : tags.sampler.loops)
+        loops.emplace_back(fmt::format("{}-{}", loop.firstFrame, loop.lastFrame));
     for (const LoopTags::Chunk& chunk : tags.chunks)
         ids.emplace_back(chunk.id);
+    record.member("sources", sources).member("loops", loops).member("markers", tags.sampler.markers.size());
     return csvRow(kColumns, record.member("transients", tags.transients.size()).member("chunks", ids));
 }

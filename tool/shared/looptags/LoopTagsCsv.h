@@ -5,5 +5,5 @@
 #include "tool/shared/output/CsvRecords.h"
 
 CsvColumns loopColumns();
-/// Of the transients their number, of the chunks their ids.
+/// Of transients and markers their number, of chunks their ids, of loops "FIRST-LAST", of sources "NAME=CHUNK".
 std::string loopRow(const std::string& path, const LoopTags& tags);

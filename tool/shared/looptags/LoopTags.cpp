@@ -215,8 +215,8 @@ std::string sourceOf(const LoopTags& tags, std::string_view name)
     return holdsLoopChunks && source != "INST" && source != "MARK" ? "" : shown;
 }
 
-// Of all values: where no sampler's chunk said it, a loop chunk did. By the AIFF ids in either kind of file, but for
-// the texts of CAF, which stand in "info".
+} // namespace
+
 std::map<std::string, std::string, std::less<>> sourcesOf(const LoopTags& tags)
 {
     constexpr std::string_view inCategories[] = {"instrumentType", "instrumentSubType", "genre", "descriptors"};
@@ -235,8 +235,6 @@ std::map<std::string, std::string, std::less<>> sourcesOf(const LoopTags& tags)
         sources.emplace("transients", "trns");
     return sources;
 }
-
-} // namespace
 
 std::int64_t LoopTags::number(std::string_view key) const
 {

@@ -93,5 +93,8 @@ bool isAbsent(const platform::Value& value);
 std::vector<TagValue> tagValues(const LoopTags& tags);
 /// The same as records have them: what is known of the sound first, and words beside the numbers that stand for them.
 std::vector<TagValue> tagRecord(const LoopTags& tags);
+/// Of all values the chunk that says them: where no sampler's chunk does, a loop chunk. By the AIFF ids in either kind
+/// of file, but for the texts of CAF, which stand in "info".
+std::map<std::string, std::string, std::less<>> sourcesOf(const LoopTags& tags);
 /// The whole JSON object, on one line.
 void writeLoopTags(JsonWriter& json, const std::string& path, const LoopTags& tags);

@@ -23,7 +23,7 @@ std::string loopRow(const std::string& path, const LoopTags& tags)
     for (const TagValue& tag : tagRecord(tags))
         record.member(tag.name, tag.value);
     platform::Array sources, loops, ids;
-    for (const auto& [name, chunk] : tags.sources)
+    for (const auto& [name, chunk] : sourcesOf(tags))
         sources.emplace_back(fmt::format("{}={}", name, chunk));
     for (const auto& loop : tags.sampler.loops)
         loops.emplace_back(fmt::format("{}-{}", loop.firstFrame, loop.lastFrame));

@@ -8,8 +8,8 @@
 #include <span>
 
 /// Adds the sample bytes of an open file, [info.dataOffset, info.dataOffset + info.dataSize), to each of the digests,
-/// in one pass: for MD5 of a WAVE file what archives keep of its chunk "data". `goesOn`, asked ahead of each MiB, ends the
-/// work with kStatusUserCancelled when it says no. kStatusParameterError for a file whose samples are not known to
+/// in one pass: for MD5 of a WAVE file what archives keep of its chunk "data". `goesOn`, asked ahead of each MiB, ends
+/// the work with kStatusUserCancelled when it says no. kStatusParameterError for a file whose samples are not known to
 /// stand in one piece (dataSize 0); kStatusEndOfFile for one that became shorter; the status of a read that failed.
 KT_EXPORT std::int32_t DigestAudio(CFileIO& file, const AudioFileInfo& info, std::span<platform::Digest* const> digests,
                                    const std::function<bool()>& goesOn = {});

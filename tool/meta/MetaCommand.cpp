@@ -5,6 +5,7 @@
 #include "tool/shared/arguments/ThreadsOption.h"
 #include "tool/shared/input/FileByFile.h"
 #include "tool/shared/output/ClockTime.h"
+#include "tool/shared/output/CsvRecords.h"
 #include "tool/shared/output/DisplayWidth.h"
 #include "tool/shared/output/JsonRecords.h"
 
@@ -14,7 +15,6 @@ namespace {
 
 struct MetaOptions {
     MetaGroups only;
-    bool isCSV = false;
     unsigned threads = 0;
 };
 
@@ -44,48 +44,47 @@ std::string readable(const MetaField& field)
     return isNumber && !field.words.empty() ? fmt::format("{} {}", value, printable(field.words)) : value;
 }
 
-void writeField(JsonWriter& json, const MetaField& field)
+void tellValue(const MetaField& field, JsonWriter& json)
 {
-    json.newLine().beginObject().member("field", field.fullName());
     std::visit([&](const auto& value) { json.member("value", value); }, field.value);
-    json.knownMember("words", field.words).knownMember("seconds", field.seconds);
-    json.knownMember("size", field.byteSize).knownMember("ascii", field.ascii);
-    if (field.isLatin1)
-        json.member("encoding", kLatin1);
-    if (field.chunk != 0)
-        json.member("chunk", fourCCText(field.chunk)).member("offset", field.offset);
-    json.endObject();
 }
 
-/// RFC 4180.
-std::string quoted(const std::string& text)
+/// As text, since a record's numbers have a sign.
+void tellValue(const MetaField& field, Record& record)
 {
-    if (text.find_first_of(",\"\r\n") == std::string::npos)
-        return text;
-    std::string field = "\"";
-    for (const char c : text)
-        field += c == '"' ? "\"\"" : std::string(1, c);
-    return field + '"';
+    record.member("value", valueText(field));
+}
+
+/// The keys of JSON and the columns of CSV; `sink` is either's record.
+template <class Sink>
+void tell(const MetaField& field, Sink& sink)
+{
+    sink.member("field", field.fullName());
+    tellValue(field, sink);
+    sink.knownMember("words", field.words).knownMember("seconds", field.seconds);
+    sink.knownMember("size", field.byteSize).knownMember("ascii", field.ascii);
+    if (field.isLatin1)
+        sink.member("encoding", kLatin1);
+    if (field.chunk != 0)
+        sink.member("chunk", fourCCText(field.chunk)).member("offset", field.offset);
 }
 
 // Writes the fields of one file after the other, each as soon as they are read.
 class MetaWriter {
 public:
     /// With `several` files each line says which.
-    MetaWriter(const OutputOptions& options, bool isCSV, bool several)
-        : form_(isCSV ? Form::none : outputForm(options)),
-          isCSV_(isCSV && !options.quiet),
+    MetaWriter(const OutputOptions& options, bool several)
+        : form_(outputForm(options)),
           color_(usesColor(options.color)),
           several_(several),
-          json_(options)
+          json_(options),
+          csv_(options, kColumns)
     {
-        if (isCSV_)
-            output_.write("path,field,value,seconds,words,size,encoding,chunk,offset\r\n");
     }
 
     void add(const std::string& path, const FileMetadata& metadata)
     {
-        if (isCSV_)
+        if (form_ == Form::csv)
             addRows(path, metadata);
         else if (form_ == Form::json)
             addRecord(path, metadata);
@@ -99,9 +98,17 @@ public:
                               field.seconds ? timeText(*field.seconds) : "");
     }
 
-    void addFailure(const std::string& path, const std::string& text) { json_.addFailure(path, text); }
+    void addFailure(const std::string& path, const std::string& text)
+    {
+        json_.addFailure(path, text);
+        csv_.addFailure(path, text);
+    }
 
-    void finish() { json_.finish(); }
+    void finish()
+    {
+        json_.finish();
+        csv_.finish();
+    }
 
 private:
     void addRecord(const std::string& path, const FileMetadata& metadata)
@@ -111,20 +118,25 @@ private:
         if (metadata.container != 0)
             json.member("container", fourCCText(metadata.container));
         json.key("fields").beginArray();
-        for (const MetaField& field : metadata.fields)
-            writeField(json, field);
+        for (const MetaField& field : metadata.fields) {
+            tell(field, json.newLine().beginObject());
+            json.endObject();
+        }
         json.endArrayOfLines().endObject();
         json_.end();
     }
 
+    /// One for each field; of a file that says nothing one that has the path alone.
     void addRows(const std::string& path, const FileMetadata& metadata)
     {
-        for (const MetaField& field : metadata.fields)
-            output_.print("{},{},{},{},{},{},{},{},{}\r\n", quoted(path), quoted(field.fullName()),
-                          quoted(valueText(field)), field.seconds ? fmt::format("{}", *field.seconds) : "",
-                          quoted(field.words), field.byteSize ? fmt::format("{}", *field.byteSize) : "",
-                          field.isLatin1 ? kLatin1 : "", field.chunk != 0 ? quoted(fourCCText(field.chunk)) : "",
-                          field.chunk != 0 ? fmt::format("{}", field.offset) : "");
+        const Record file = Record().member("path", path);
+        if (metadata.fields.empty())
+            csv_.add(file);
+        for (const MetaField& field : metadata.fields) {
+            Record record = file;
+            tell(field, record);
+            csv_.add(record);
+        }
     }
 
     /// A heading for each chunk, its fields below it, their values in one column.
@@ -168,14 +180,17 @@ private:
     const char* bold() const { return color_ ? "\x1b[1m" : ""; }
     const char* plain() const { return color_ ? "\x1b[0m" : ""; }
 
+    static constexpr const char* kColumns[] = {"path",  "field",    "value", "seconds", "words", "size",
+                                               "ascii", "encoding", "chunk", "offset",  "error"};
+
     Form form_;
-    bool isCSV_;
     bool color_;
     bool several_;
     bool isFirst_ = true;
     int width_ = 0;
     Output& output_ = Output::standard();
     JsonRecords json_;
+    CsvRecords csv_;
 };
 
 std::string lowered(std::string text)
@@ -204,9 +219,7 @@ MetaGroups groupsFromText(const std::string& text)
 
 bool runMeta(const FileArguments& files, const MetaOptions& wanted, const OutputOptions& options)
 {
-    if (wanted.isCSV && options.wantsJson())
-        throw UsageError("--csv and JSON exclude each other");
-    MetaWriter writer(options, wanted.isCSV, files.maybeSeveral());
+    MetaWriter writer(options, files.maybeSeveral());
     const FileLoop loop{.threads = wanted.threads, .quiet = options.quiet};
     return writeFileByFile(writer, files, loop, [&](const FoundFile& file) {
         const FileAccess access = accessForReading(file.path, {.quiet = options.quiet});
@@ -227,7 +240,7 @@ void declareMeta(CommandLine& commandLine)
         });
     CommandLine::addFilesOrInput(verb, files);
     addThreads(verb, wanted.threads);
-    verb.addFlag("--csv", wanted.isCSV, "Print comma-separated values (RFC 4180), with a header");
+    commandLine.addCsv(verb);
     verb.addText("--only", only, "Only these, behind commas: bext, ixml, info, cue, smpl, … or ids of chunks")
         .label("GROUPS");
 }

@@ -96,7 +96,7 @@ void declareTags(CommandLine& commandLine)
 {
     static FileArguments files;
     static unsigned threads = 0;
-    Verb& verb = commandLine.addVerb("tags", "Show the loop tags of AIFF and CAF files; set, remove or copy some",
+    Verb& verb = commandLine.addVerb("tags", "Show the tags of loops, and where they stand; set, remove or copy some",
                                      [&commandLine] { return runTags(files, threads, commandLine.output()); });
     CommandLine::addFilesOrInput(verb, files);
     commandLine.addCsv(verb);

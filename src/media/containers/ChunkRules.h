@@ -1,6 +1,5 @@
 // What the rules of the formats say of single chunks: which a file has one of, and how long they are at least.
-// Published sources as in ContainerTraits.h; EBU Tech 3285 of "bext", the RIFF specification of 1991 and its successors
-// of others.
+// Published sources as in ContainerTraits.h; EBU Tech 3285 of "bext", RIFF of 1991 and its successors of others.
 #pragma once
 
 #include "media/containers/ContainerTraits.h"

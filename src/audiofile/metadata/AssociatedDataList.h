@@ -37,7 +37,7 @@ struct CueRange : CueRangeFields {
     friend bool operator==(const CueRange&, const CueRange&) = default;
 };
 
-/// Published source: Multimedia Programming Interface and Data Specifications 1.0, Associated Data Chunk. Items that
+/// Published source: RIFF 1.0 of 1991, Associated Data Chunk. Items that
 /// are none of "labl", "note" and "ltxt" are kept.
 class KT_EXPORT AssociatedDataList : public ListChunk {
 public:

@@ -25,7 +25,7 @@ struct CuePoint {
 };
 static_assert(sizeof(CuePoint) == 24 && offsetof(CuePoint, sampleOffset) == 20);
 
-/// Published source: Multimedia Programming Interface and Data Specifications 1.0, Cue-Points Chunk.
+/// Published source: RIFF 1.0 of 1991, Cue-Points Chunk.
 struct KT_EXPORT CueList {
     /// None of fewer than 4 bytes. Of RIFX the order is big.
     static std::optional<CueList> read(BytesView body, std::endian order = std::endian::little);

@@ -3,7 +3,7 @@
 
 #include "audiofile/metadata/ListChunk.h"
 
-/// Published source: Multimedia Programming Interface and Data Specifications 1.0, INFO List Chunk. Texts are bytes up
+/// Published source: RIFF 1.0 of 1991, INFO List Chunk. Texts are bytes up
 /// to a NUL; the source says nothing of their encoding.
 class KT_EXPORT InfoList : public ListChunk {
 public:

@@ -21,7 +21,7 @@ struct ListItem {
     friend bool operator==(const ListItem&, const ListItem&) = default;
 };
 
-/// Published source: Multimedia Programming Interface and Data Specifications 1.0, LIST Chunk. What is not changed is
+/// Published source: RIFF 1.0 of 1991, LIST Chunk. What is not changed is
 /// written as it was read, whatever its order; an edit puts pad bytes where they were left out.
 class KT_EXPORT ListChunk {
 public:

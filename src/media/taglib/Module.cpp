@@ -30,7 +30,7 @@ using namespace platform;
 using platform::taglib::Entries;
 using platform::taglib::SourceStream;
 
-/// Where the tags of a DSF file begin, by its header ("DSF File Format Specification" 1.01); 0 for none.
+/// Where the tags of a DSF file begin, by its header (DSF 1.01); 0 for none.
 std::uint64_t tagsOfDSF(BytesView start)
 {
     constexpr std::size_t kHeaderSize = 28, kPointer = 20;

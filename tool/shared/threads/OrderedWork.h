@@ -6,11 +6,13 @@
 
 #include <algorithm>
 #include <array>
+#include <chrono>
 #include <condition_variable>
 #include <deque>
 #include <functional>
 #include <mutex>
 #include <optional>
+#include <span>
 #include <vector>
 
 /// One thread gives jobs, one takes results. `work` runs on all threads at once and must not throw. Of the threads as
@@ -33,7 +35,7 @@ public:
     }
     ~OrderedWork() { stop(); }
 
-    /// Waits for room; false when no more is wanted.
+    /// Waits for room, of half the window once it is full; false when no more is wanted.
     bool give(Job job)
     {
         std::unique_lock lock(mutex_);
@@ -72,7 +74,8 @@ public:
         std::optional<Result> result = std::move(*entries_.front().result);
         entries_.pop_front();
         --started_;
-        room_.notify_one();
+        if (entries_.size() == window_ / 2) // half of it at once: a wait for each job costs more than small jobs do
+            room_.notify_one();
         return result;
     }
     /// Ends all waiting of those that give jobs and of the workers.
@@ -103,18 +106,30 @@ private:
             const std::size_t count = std::clamp<std::size_t>(share, 1, kMostAtOnce);
             for (std::size_t i = 0; i < count; ++i)
                 taken[i] = &entries_[started_++];
-            for (std::size_t i = 0; i < count && !stopped_; ++i) {
-                lock.unlock();
-                Result result = work_(taken[i]->job);
-                lock.lock();
-                taken[i]->result = std::move(result);
-                if (taken[i] == &entries_.front())
-                    done_.notify_one();
-            }
+            workOn(std::span(taken).first(count), lock);
+        }
+    }
+    /// Results of quick jobs are handed over together, and none is kept for long.
+    void workOn(std::span<Entry* const> taken, std::unique_lock<std::mutex>& lock)
+    {
+        std::array<std::optional<Result>, kMostAtOnce> results;
+        for (std::size_t first = 0, next = 0; next < taken.size() && !stopped_; first = next) {
+            lock.unlock();
+            const auto start = std::chrono::steady_clock::now();
+            do {
+                results[next].emplace(work_(taken[next]->job));
+                ++next;
+            } while (next < taken.size() && std::chrono::steady_clock::now() - start < kLongestKept);
+            lock.lock();
+            for (std::size_t i = first; i < next; ++i)
+                taken[i]->result = std::move(results[i]);
+            if (taken[first] == &entries_.front())
+                done_.notify_one();
         }
     }
 
     static constexpr std::size_t kMostAtOnce = 8;
+    static constexpr std::chrono::microseconds kLongestKept{200};
 
     std::mutex mutex_;
     std::condition_variable room_, ready_, done_;

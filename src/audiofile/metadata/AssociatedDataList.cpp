@@ -118,6 +118,15 @@ void AssociatedDataList::put(FourCC id, std::uint32_t cueId, Bytes body)
         replaceBody(index, std::move(body));
 }
 
+bool AssociatedDataList::eraseFirst(FourCC id, std::uint32_t cueId)
+{
+    const auto found = std::ranges::find_if(items(), speaksOf(id, cueId, order()));
+    if (found == items().end())
+        return false;
+    erase(static_cast<std::size_t>(found - items().begin()));
+    return true;
+}
+
 void AssociatedDataList::eraseCue(std::uint32_t cueId)
 {
     eraseCues([cueId](std::uint32_t each) { return each == cueId; });

@@ -61,6 +61,8 @@ public:
     void setLabel(std::uint32_t cueId, std::string_view text) { setText(fourCC("labl"), cueId, text); }
     void setNote(std::uint32_t cueId, std::string_view text) { setText(fourCC("note"), cueId, text); }
     void setRange(const CueRange& range);
+    /// The first item of the id ("labl", "note" or "ltxt") of a point; false when there is none.
+    bool eraseFirst(FourCC id, std::uint32_t cueId);
     /// All that is said of a point.
     void eraseCue(std::uint32_t cueId);
 

@@ -131,6 +131,38 @@ bool InfoList::erase(FourCC id)
     return items().size() != before;
 }
 
+std::size_t InfoList::place(FourCC id, std::size_t index) const
+{
+    const auto found =
+        std::ranges::find_if(items(), [&](const ListItem& item) { return item.id == id && index-- == 0; });
+    return static_cast<std::size_t>(found - items().begin());
+}
+
+void InfoList::setAt(FourCC id, std::size_t index, std::string_view text)
+{
+    if (const std::size_t at = place(id, index); at == items().size())
+        insert(at, id, textAndNUL(text));
+    else
+        replaceBody(at, textAndNUL(text));
+}
+
+bool InfoList::eraseAt(FourCC id, std::size_t index)
+{
+    const std::size_t at = place(id, index);
+    if (at == items().size())
+        return false;
+    ListChunk::erase(at);
+    return true;
+}
+
+std::vector<FourCC> InfoList::knownIds()
+{
+    std::vector<FourCC> ids;
+    for (const auto& row : kWords)
+        ids.push_back(row.first);
+    return ids;
+}
+
 std::string_view InfoList::words(FourCC id)
 {
     const auto row = std::ranges::lower_bound(kWords, id, {}, &std::pair<FourCC, std::string_view>::first);

@@ -21,6 +21,18 @@ public:
     /// False when there is none.
     bool erase(FourCC id);
 
+    // By the index of a text among those of its id, of which the others stay:
+
+    /// Behind the last item when `index` is their number or more.
+    void setAt(FourCC id, std::size_t index, std::string_view text);
+    bool eraseAt(FourCC id, std::size_t index);
+
+    /// The ids that stand for something, in their order.
+    static std::vector<FourCC> knownIds();
     /// What an id stands for, in words ("Artist" of "IART"); empty of an id that is in no list of them.
     static std::string_view words(FourCC id);
+
+private:
+    /// The number of items when there is no such text.
+    std::size_t place(FourCC id, std::size_t index) const;
 };

@@ -9,6 +9,10 @@ _ktfiles()
     local files='--files-from --null'
     local keys='beatCount midiRootNote keyType signatureTop signatureBottom loopFileType instrumentType
         instrumentSubType genre descriptors title artist copyright comments transients key mode signature beats category subCategory kind'
+    local fields='bext.description bext.originator bext.originatorReference bext.originationDate bext.originationTime bext.timeReference
+        bext.version bext.umid bext.loudnessValue bext.loudnessRange bext.maxTruePeakLevel bext.maxMomentaryLoudness
+        bext.maxShortTermLoudness bext.codingHistory info.INAM info.IART info.ICMT info.ICRD info.ICOP info.IGNR info.IPRD info.ISFT
+        acid.tempo acid.beats acid.rootNote smpl.midiUnityNote cart.title cart.artist ixml.PROJECT ixml.SCENE ixml.TAKE ixml.NOTE NAME AUTH ANNO'
     local projects='media dirs backup restore settle rename-alternative'
     local verb=${words[1]} object=${words[2]}
 
@@ -50,6 +54,8 @@ _ktfiles()
             COMPREPLY=($(compgen -W 'get add remove' -- "$cur"))
         elif ((cword == 3)) && [[ $object == tags ]]; then
             COMPREPLY=($(compgen -W 'set remove copy' -- "$cur"))
+        elif ((cword == 3)) && [[ $object == meta ]]; then
+            COMPREPLY=($(compgen -W 'set remove' -- "$cur"))
         elif ((cword == 3)) && [[ $object == project ]]; then
             COMPREPLY=($(compgen -W "$projects" -- "$cur"))
         fi
@@ -67,6 +73,8 @@ _ktfiles()
                 --force --threads $files $common" -- "$cur")) ;;
             lock/*) COMPREPLY=($(compgen -W "--read --write --presenter --timeout -- $common" -- "$cur")) ;;
             scan/*) COMPREPLY=($(compgen -W "--csv --threads $files $common" -- "$cur")) ;;
+            meta/set) COMPREPLY=($(compgen -W "--lenient $files $edit $common" -- "$cur")) ;;
+            meta/remove) COMPREPLY=($(compgen -W "$files $edit $common" -- "$cur")) ;;
             meta/*) COMPREPLY=($(compgen -W "--only --csv --threads $files $common" -- "$cur")) ;;
             tags/*) COMPREPLY=($(compgen -W "--csv --threads $files $common" -- "$cur")) ;;
             pair/*) COMPREPLY=($(compgen -W "--csv $files $common" -- "$cur")) ;;
@@ -98,6 +106,13 @@ _ktfiles()
             compopt -o nospace
         elif ((cword > 3)) && [[ $verb/$object == tags/remove ]]; then
             COMPREPLY+=($(compgen -W "$keys" -- "$cur"))
+        elif ((cword > 3)) && [[ $verb/$object == meta/set ]]; then
+            COMPREPLY+=($(compgen -S = -W "$fields" -- "$cur"))
+            compopt -o nospace
+        elif ((cword > 3)) && [[ $verb/$object == meta/remove ]]; then
+            COMPREPLY+=($(compgen -W "$fields" -- "$cur"))
+        elif ((cword == 2)) && [[ $verb == meta ]]; then
+            COMPREPLY+=($(compgen -W 'set remove' -- "$cur"))
         elif ((cword == 2)) && [[ $verb == tags ]]; then
             COMPREPLY+=($(compgen -W 'set remove copy' -- "$cur"))
         elif ((cword == 2)) && [[ $verb == chunks ]]; then

@@ -27,6 +27,8 @@ def name_of(arguments):
         return OBJECTS[item]
     if verb == "tags" and item in ("set", "remove", "copy"):
         return "tags-edit"
+    if verb == "meta" and item in ("set", "remove"):
+        return "meta-edit"
     if verb == "project" and item in ("backup", "restore", "settle", "rename-alternative"):
         return "project-edit"
     return verb

@@ -1,6 +1,5 @@
 #include "tool/meta/FileMetadata.h"
 
-#include "tool/meta/MetaReaders.h"
 #include "tool/meta/TagReader.h"
 #include "tool/shared/input/InputFile.h"
 #include "tool/shared/output/Failure.h"
@@ -108,17 +107,40 @@ void readChunk(const MetaChunk& chunk, std::span<const MetaReader> readers, cons
         fields.preview("", chunk.body, static_cast<std::uint64_t>(chunk.size));
 }
 
-FileMetadata readChunks(CAudioFileIO& file)
+HeldMetadata holdChunks(CAudioFileIO& file)
 {
     ContainerExtent extent;
-    const MetaSource source = collect(file, extent);
-    MetaFields fields(file.Info().exactSampleRate);
-    for (const MetaChunk& chunk : source.chunks)
-        readChunk(chunk, readersOf(extent), source, fields);
-    return {extent.id, fields.take()};
+    HeldMetadata held;
+    held.source = collect(file, extent);
+    held.container = extent.id;
+    held.readers = readersOf(extent);
+    held.sampleRate = file.Info().exactSampleRate;
+    held.frames = file.InfoStatus() == kStatusOK ? file.Info().frames : -1;
+    return held;
+}
+
+FileMetadata readChunks(CAudioFileIO& file)
+{
+    const HeldMetadata held = holdChunks(file);
+    return {held.container, fieldsOf(held)};
 }
 
 } // namespace
+
+HeldMetadata holdMetadata(const std::string& path)
+{
+    CAudioFileIO file;
+    openChunks(file, path);
+    return holdChunks(file);
+}
+
+std::vector<MetaField> fieldsOf(const HeldMetadata& held)
+{
+    MetaFields fields(held.sampleRate);
+    for (const MetaChunk& chunk : held.source.chunks)
+        readChunk(chunk, held.readers, held.source, fields);
+    return fields.take();
+}
 
 FileMetadata readMetadata(const std::string& path, const MetaGroups& groups)
 {

@@ -1,12 +1,25 @@
 // The metadata of one file, read by field.
 #pragma once
 
-#include "tool/meta/MetaFields.h"
+#include "tool/meta/MetaReaders.h"
 
 struct FileMetadata {
     FourCC container = 0; // the outermost id: "RIFF", "FORM", "caff" …; 0 of a file without chunks
     std::vector<MetaField> fields;
 };
+
+/// The chunks that fields are made of, in memory.
+struct HeldMetadata {
+    FourCC container = 0;
+    std::span<const MetaReader> readers;
+    MetaSource source;
+    double sampleRate = 0;    // 0 unknown
+    std::int64_t frames = -1; // of the sound; below 0 unknown
+};
+
+/// Throws as readMetadata does.
+HeldMetadata holdMetadata(const std::string& path);
+std::vector<MetaField> fieldsOf(const HeldMetadata& held);
 
 /// Which groups of fields are wanted, in small letters; empty: all.
 using MetaGroups = std::vector<std::string>;

@@ -1,4 +1,5 @@
-// ktfiles meta: what files say about themselves, by field.
+#include "tool/meta/MetaCommand.h"
+
 #include "tool/meta/FileMetadata.h"
 #include "tool/shared/access/FileAccess.h"
 #include "tool/shared/arguments/CommandLine.h"
@@ -232,17 +233,18 @@ void declareMeta(CommandLine& commandLine)
     static FileArguments files;
     static MetaOptions wanted;
     static std::string only;
-    Verb& verb =
-        commandLine.addVerb("meta", "Show what files say about themselves, by field: chunks and tags", [&commandLine] {
-            if (!only.empty())
-                wanted.only = groupsFromText(only);
-            return runMeta(files, wanted, commandLine.output());
-        });
+    Verb& verb = commandLine.addVerb("meta", "Show what files say about themselves, by field; set or remove fields",
+                                     [&commandLine] {
+                                         if (!only.empty())
+                                             wanted.only = groupsFromText(only);
+                                         return runMeta(files, wanted, commandLine.output());
+                                     });
     CommandLine::addFilesOrInput(verb, files);
     addThreads(verb, wanted.threads);
     commandLine.addCsv(verb);
     verb.addText("--only", only, "Only these, behind commas: bext, ixml, info, cue, smpl, … or ids of chunks")
         .label("GROUPS");
+    declareMetaEdits(commandLine, verb);
 }
 
 const VerbRegistration registration{35, declareMeta};

@@ -1,0 +1,219 @@
+// How fields of AIFF and AIFC are set.
+#include "audiofile/metadata/CommentList.h"
+#include "audiofile/metadata/MarkerList.h"
+#include "tool/meta/MetaEdit.h"
+
+#include <algorithm>
+#include <ctime>
+#include <limits>
+
+namespace {
+
+constexpr FourCC kAnnotation = fourCC("ANNO"), kComments = fourCC("COMT"), kMarkers = fourCC("MARK");
+constexpr double kNoLimit = 1e9;
+constexpr std::int16_t kMostId = std::numeric_limits<std::int16_t>::max();
+
+Bytes asBytes(const std::string& text)
+{
+    return {bytesOf(text).begin(), bytesOf(text).end()};
+}
+
+/// The whole chunk is the text.
+template <FourCC id>
+void setText(MetaEdit& edit, const MetaStep& step)
+{
+    std::size_t count = 0;
+    while (edit.find(id, count) != nullptr)
+        ++count;
+    const bool isFirst = step.name.parts[0].index.empty() && count == 0;
+    const auto index = isFirst && !step.isRemoval() ? 0 : edit.itemOf(step, 0, count);
+    if (!index)
+        return;
+    MetaChunk* const chunk = edit.find(id, *index);
+    if (chunk == nullptr)
+        edit.add(id, asBytes(step.string()));
+    else if (!step.isRemoval())
+        edit.replace(*chunk, asBytes(step.string()));
+    else
+        edit.remove(*chunk);
+    if (step.isRemoval() && count > 1)
+        edit.itemRemoved(step, 0);
+}
+
+// "comt":
+
+template <class List>
+void putList(MetaEdit& edit, FourCC id, const List& list, bool isEmpty)
+{
+    MetaChunk* const chunk = edit.find(id);
+    if (isEmpty && chunk != nullptr)
+        edit.remove(*chunk);
+    else if (chunk != nullptr)
+        edit.replace(*chunk, list.write());
+    else
+        edit.add(id, list.write());
+}
+
+CommentList commentsOf(MetaEdit& edit)
+{
+    const MetaChunk* const chunk = edit.find(kComments);
+    auto list = chunk != nullptr ? CommentList::read(chunk->body) : CommentList();
+    if (!list)
+        MetaEdit::refuseDamaged(kComments);
+    return *list;
+}
+
+template <class Change>
+void changeComment(MetaEdit& edit, const MetaStep& step, Change change)
+{
+    CommentList list = commentsOf(edit);
+    const auto index = edit.itemOf(step, 0, list.comments.size());
+    if (!index)
+        return;
+    if (*index == list.comments.size()) {
+        if (list.missingComments != 0)
+            MetaEdit::refuseDamaged(kComments);
+        list.lastIsPadded = true;
+        list.comments.emplace_back().timeStamp =
+            static_cast<std::uint32_t>(std::time(nullptr)) + AIFFComment::kSecondsTo1970;
+    }
+    change(list, *index);
+    putList(edit, kComments, list, false);
+}
+
+void setCommentText(MetaEdit& edit, const MetaStep& step)
+{
+    changeComment(edit, step, [&](CommentList& list, std::size_t index) {
+        list.comments[index].text = step.string();
+        list.lastIsPadded = list.lastIsPadded || index + 1 == list.comments.size();
+    });
+}
+
+void setCommentTime(MetaEdit& edit, const MetaStep& step)
+{
+    changeComment(edit, step, [&](CommentList& list, std::size_t index) {
+        list.comments[index].timeStamp = static_cast<std::uint32_t>(step.number());
+    });
+}
+
+MarkerList markersOf(MetaEdit& edit)
+{
+    const MetaChunk* const chunk = edit.find(kMarkers);
+    auto list = chunk != nullptr ? MarkerList::read(chunk->body) : MarkerList();
+    if (!list)
+        MetaEdit::refuseDamaged(kMarkers);
+    return *list;
+}
+
+void setCommentMarker(MetaEdit& edit, const MetaStep& step)
+{
+    const auto id = static_cast<std::int16_t>(step.number());
+    if (id != 0 && markersOf(edit).find(id) == nullptr && !edit.isLenient())
+        MetaEdit::refuse(step, "there is no marker of this id; --lenient writes it");
+    changeComment(edit, step, [&](CommentList& list, std::size_t index) { list.comments[index].marker = id; });
+}
+
+void removeComment(MetaEdit& edit, const MetaStep& step)
+{
+    CommentList list = commentsOf(edit);
+    const auto index = edit.itemOf(step, 0, list.comments.size());
+    if (!index)
+        return;
+    if (list.missingComments != 0)
+        MetaEdit::refuseDamaged(kComments);
+    list.comments.erase(list.comments.begin() + static_cast<std::ptrdiff_t>(*index));
+    edit.itemRemoved(step, 0);
+    putList(edit, kComments, list, list.comments.empty() && list.behind.empty());
+}
+
+// "mark":
+
+template <class Change>
+void changeMarker(MetaEdit& edit, const MetaStep& step, Change change)
+{
+    MarkerList list = markersOf(edit);
+    const auto index = edit.itemOf(step, 0, list.markers.size());
+    if (!index)
+        return;
+    if (*index == list.markers.size()) {
+        if (!edit.names(step.name.upTo(0) + ".position"))
+            MetaEdit::refuse(step, "a new marker needs its position");
+        if (list.missingMarkers != 0)
+            MetaEdit::refuseDamaged(kMarkers);
+        std::int16_t id = 0;
+        for (const AIFFMarker& marker : list.markers)
+            id = std::max(id, marker.id);
+        if (id == kMostId || list.markers.size() == MarkerList::kMostMarkers)
+            MetaEdit::refuse(step, "there is no id above those of the others");
+        list.markers.emplace_back().id = static_cast<std::int16_t>(id + 1);
+    }
+    change(list, list.markers[*index]);
+    putList(edit, kMarkers, list, false);
+}
+
+void setMarkerName(MetaEdit& edit, const MetaStep& step)
+{
+    changeMarker(edit, step, [&](MarkerList&, AIFFMarker& marker) {
+        marker.name = step.string();
+        marker.pad = std::byte{0};
+    });
+}
+
+void setMarkerPosition(MetaEdit& edit, const MetaStep& step)
+{
+    changeMarker(edit, step, [&](MarkerList&, AIFFMarker& marker) {
+        marker.position = static_cast<std::uint32_t>(edit.framesWithinSound(step));
+    });
+}
+
+void setMarkerId(MetaEdit& edit, const MetaStep& step)
+{
+    changeMarker(edit, step, [&](MarkerList& list, AIFFMarker& marker) {
+        const auto id = static_cast<std::int16_t>(step.number());
+        const AIFFMarker* const other = list.find(id);
+        if (other != nullptr && other != &marker)
+            MetaEdit::refuse(step, "another marker has this id");
+        marker.id = id;
+    });
+}
+
+void removeMarker(MetaEdit& edit, const MetaStep& step)
+{
+    MarkerList list = markersOf(edit);
+    const auto index = edit.itemOf(step, 0, list.markers.size());
+    if (!index)
+        return;
+    if (list.missingMarkers != 0)
+        MetaEdit::refuseDamaged(kMarkers);
+    list.markers.erase(list.markers.begin() + static_cast<std::ptrdiff_t>(*index));
+    edit.itemRemoved(step, 0);
+    putList(edit, kMarkers, list, list.markers.empty() && list.behind.empty());
+}
+
+using K = MetaKind;
+
+constexpr MetaRule kRules[] = {
+    {"NAME", K::text, {0, kNoLimit}, setText<fourCC("NAME")>},
+    {"AUTH", K::text, {0, kNoLimit}, setText<fourCC("AUTH")>},
+    {"(c)", K::text, {0, kNoLimit}, setText<fourCC("(c) ")>},
+    {"ANNO", K::text, {0, kNoLimit}, setText<kAnnotation>},
+
+    {"comt[N].text", K::text, {0, 65535}, setCommentText},
+    {"comt[N].timeStamp", K::moment, {}, setCommentTime},
+    {"comt[N].marker", K::integer, {0, 32767}, setCommentMarker},
+    {"comt[N]", K::none, {}, removeComment},
+    {"comt", K::none, {}, removeChunk<kComments>},
+
+    {"mark[N].position", K::time, {}, setMarkerPosition},
+    {"mark[N].name", K::text, {0, 255}, setMarkerName},
+    {"mark[N].id", K::integer, {1, 32767}, setMarkerId},
+    {"mark[N]", K::none, {}, removeMarker},
+    {"mark", K::none, {}, removeChunk<kMarkers>},
+};
+
+} // namespace
+
+std::span<const MetaRule> aiffRules()
+{
+    return kRules;
+}

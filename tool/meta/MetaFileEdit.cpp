@@ -1,0 +1,169 @@
+#include "tool/meta/MetaFileEdit.h"
+
+#include "media/userdata/AudioFileService.h"
+#include "platform/core/Status.h"
+#include "tool/shared/edits/EditProblems.h"
+#include "tool/shared/input/FileLocation.h"
+#include "tool/shared/input/InputFile.h"
+#include "tool/shared/output/Failure.h"
+
+#include <fmt/format.h>
+
+#include <algorithm>
+#include <limits>
+#include <set>
+
+using platform::AudioFile;
+
+namespace {
+
+std::vector<const MetaChunk*> chunksOf(const HeldMetadata& held, FourCC id)
+{
+    std::vector<const MetaChunk*> chunks;
+    for (const MetaChunk& chunk : held.source.chunks)
+        if (chunk.id == id)
+            chunks.push_back(&chunk);
+    return chunks;
+}
+
+/// Chunks keep their offset in the plan, by which the same one is known before and after.
+void addItems(MetaPlan& plan, FourCC id)
+{
+    const auto before = chunksOf(plan.before, id), after = chunksOf(plan.after, id);
+    std::vector<MetaItemEdit> removals;
+    for (std::uint32_t index = 0; index < before.size(); ++index) {
+        const auto now = std::ranges::find(after, before[index]->offset, &MetaChunk::offset);
+        if (now == after.end())
+            removals.push_back({id, index, std::nullopt});
+        else if ((*now)->body != before[index]->body)
+            plan.items.push_back({id, index, (*now)->body});
+    }
+    auto index = static_cast<std::uint32_t>(before.size());
+    for (const MetaChunk* chunk : after)
+        if (chunk->offset < 0)
+            plan.items.push_back({id, index++, chunk->body});
+    plan.items.insert(plan.items.end(), removals.begin(), removals.end());
+}
+
+bool isBelow(std::string_view field, std::string_view item)
+{
+    return field.starts_with(item) && (field.size() == item.size() || field[item.size()] == '.');
+}
+
+/// What fields say that were there, are there, or both. Where an item went by its index, the names of what follows say
+/// something else now, which is no change: of its group the item's own fields count, and those that were set.
+std::vector<MetaChange> changesOf(const MetaPlan& plan, const std::vector<std::string>& removedItems,
+                                  const std::vector<MetaStep>& steps)
+{
+    std::set<std::string, std::less<>> shifted;
+    for (const std::string& item : removedItems)
+        shifted.insert(item.substr(0, item.find_first_of(".[")));
+    std::map<std::string, const MetaField*, std::less<>> before, after;
+    const std::vector<MetaField> fieldsBefore = fieldsOf(plan.before), fieldsAfter = fieldsOf(plan.after);
+    for (const MetaField& field : fieldsBefore)
+        before.emplace(field.fullName(), &field);
+    for (const MetaField& field : fieldsAfter)
+        after.emplace(field.fullName(), &field);
+    std::vector<MetaChange> changes;
+    for (const MetaField& field : fieldsAfter) {
+        const std::string name = field.fullName();
+        const auto old = before.find(name);
+        if (shifted.contains(field.group) || (old != before.end() && old->second->value == field.value))
+            continue;
+        changes.push_back({name, old != before.end() ? std::optional(old->second->value) : std::nullopt, field.value});
+    }
+    for (const MetaField& field : fieldsBefore) {
+        const std::string name = field.fullName();
+        const bool isNamed = std::ranges::any_of(steps, [&](const MetaStep& step) {
+            return (!step.text || step.text->empty()) && isBelow(name, step.name.text);
+        });
+        if (shifted.contains(field.group) ? isNamed : !after.contains(name))
+            changes.push_back({name, field.value, std::nullopt});
+    }
+    for (const MetaStep& step : steps)
+        if (step.text && !step.text->empty() && shifted.contains(step.name.group()))
+            changes.push_back({step.name.text, std::nullopt, *step.text});
+    return changes;
+}
+
+/// An unfinished recording behind the chunks, say. What keeps its size is written where it stands.
+void requireRoom(const std::string& path, const MetaPlan& plan)
+{
+    const bool staysInPlace = std::ranges::all_of(plan.items, [&](const MetaItemEdit& item) {
+        const auto before = chunksOf(plan.before, item.id);
+        return item.body && item.index < before.size() && std::ssize(*item.body) == before[item.index]->size;
+    });
+    if (staysInPlace)
+        return;
+    constexpr FourCC some = fourCC("bext"); // of which there may be several
+    CAudioFileIO file;
+    openContainer(file, path, 0);
+    if (const auto objection = objectionToAdding(file, surveyChunks(file, some), some))
+        throw Failure(*objection);
+}
+
+std::unique_ptr<AudioFile> openItems(const std::string& path, AudioFile::Permission permission)
+{
+    std::int32_t status = kStatusOK;
+    auto file = AudioFile::open(*fileLocation(path), permission, 0, &status);
+    if (file == nullptr)
+        requireOK(status);
+    return file;
+}
+
+} // namespace
+
+MetaPlan planMetadata(const std::string& path, const std::vector<MetaStep>& steps, bool isLenient)
+{
+    {
+        CAudioFileIO file;
+        openContainer(file, path, 0); // says which containers are only read
+    }
+    MetaPlan plan;
+    plan.before = holdMetadata(path);
+    plan.after = plan.before;
+    MetaEdit edit(plan.after, steps, isLenient);
+    edit.apply();
+    for (const FourCC id : edit.touched())
+        addItems(plan, id);
+    for (const MetaItemEdit& item : plan.items)
+        if (std::ranges::find(plan.ids, item.id) == plan.ids.end())
+            plan.ids.push_back(item.id);
+    requireRoom(path, plan);
+    plan.changes = changesOf(plan, edit.removedItems(), steps);
+    return plan;
+}
+
+void writeMetadata(const std::string& path, const MetaPlan& plan)
+{
+    {
+        const auto file = openItems(path, AudioFile::Permission::readWrite);
+        for (const FourCC id : plan.ids) {
+            const auto before = chunksOf(plan.before, id);
+            std::uint32_t count = 0, size = 0;
+            requireOK(file->countUserData(id, count));
+            if (count != before.size())
+                throw Failure(fmt::format("its chunks \"{}\" are not all in its container", fourCCText(id)));
+            for (std::uint32_t index = 0; index < count; ++index)
+                if (requireOK(file->userDataSize(id, index, size)); std::int64_t{size} != before[index]->size)
+                    throw Failure(fmt::format("its chunk \"{}\" is damaged", fourCCText(id)));
+        }
+        std::map<FourCC, std::vector<std::uint32_t>> removals;
+        for (const MetaItemEdit& item : plan.items) {
+            if (!item.body)
+                removals[item.id].push_back(item.index);
+            else if (item.body->size() > std::numeric_limits<std::uint32_t>::max())
+                throw Failure(fmt::format("its chunk \"{}\" would be too large", fourCCText(item.id)));
+            else
+                requireOK(file->setUserData(item.id, item.index, static_cast<std::uint32_t>(item.body->size()),
+                                            item.body->data()));
+        }
+        for (const auto& [id, indices] : removals)
+            requireOK(file->removeUserData(id, indices));
+    }
+    const HeldMetadata found = holdMetadata(path);
+    for (const FourCC id : plan.ids)
+        if (!std::ranges::equal(chunksOf(found, id), chunksOf(plan.after, id),
+                                [](const MetaChunk* a, const MetaChunk* b) { return a->body == b->body; }))
+            throw Failure(fmt::format("its chunk \"{}\" is not found as it should be after the edit", fourCCText(id)));
+}

@@ -1,0 +1,31 @@
+// Edits of the metadata of one file: worked out in memory, made through the audio-file service, read again.
+#pragma once
+
+#include "tool/meta/MetaEdit.h"
+
+/// One field before and after.
+struct MetaChange {
+    std::string field;
+    std::optional<MetaField::Value> from, to; // none: not there
+};
+
+/// One chunk to write or to remove: by its id and its index among those of the id.
+struct MetaItemEdit {
+    FourCC id = 0;
+    std::uint32_t index = 0;
+    std::optional<Bytes> body; // none: it goes
+};
+
+struct MetaPlan {
+    std::vector<MetaChange> changes;
+    std::vector<MetaItemEdit> items; // those that are written in order of index, removals last
+    std::vector<FourCC> ids;         // of the chunks that change
+    HeldMetadata before, after;
+};
+
+/// Throws Failure.
+MetaPlan planMetadata(const std::string& path, const std::vector<MetaStep>& steps, bool isLenient);
+
+/// Makes the edit of the file itself, and reads it again. Throws Failure, also when a chunk is then not found as it
+/// should be.
+void writeMetadata(const std::string& path, const MetaPlan& plan);

@@ -1,0 +1,199 @@
+// ktfiles meta set, and remove.
+#include "tool/meta/MetaCommand.h"
+#include "tool/meta/MetaFileEdit.h"
+#include "tool/shared/access/FileAccess.h"
+#include "tool/shared/arguments/CommandLine.h"
+#include "tool/shared/arguments/QuotedText.h"
+#include "tool/shared/output/Failure.h"
+#include "tool/shared/output/JsonRecords.h"
+#include "tool/shared/output/ShownName.h"
+#include "tool/shared/output/Terminal.h"
+
+#include <algorithm>
+#include <sys/stat.h>
+
+namespace {
+
+struct EditArguments {
+    std::vector<std::string> words;
+    FileArguments files; // those of the list; the others are among the words
+    bool isLenient = false;
+    EditOptions options;
+};
+
+struct EditWords {
+    const char *action, *done, *dryRun;
+};
+
+std::string meantText(std::string_view text)
+{
+    if (!isQuoted(text))
+        return std::string(text);
+    std::string meant = takeQuotedText(text);
+    if (!text.empty())
+        throw UsageError("\"" + printable(text) + "\" follows a value in $'…'");
+    return meant;
+}
+
+void addStep(std::vector<MetaStep>& steps, MetaStep step)
+{
+    for (const MetaStep& other : steps)
+        if (other.name.text == step.name.text && other.text != step.text)
+            throw UsageError(printable(step.name.text) + " is set twice, to different values");
+    if (std::ranges::none_of(steps, [&](const MetaStep& other) { return other.name.text == step.name.text; }))
+        steps.push_back(std::move(step));
+}
+
+/// A word with "=" and no "/" ahead of it is a field with its value; the others are files.
+std::vector<MetaStep> takeAssignments(EditArguments& arguments)
+{
+    std::vector<MetaStep> steps;
+    for (const std::string& word : arguments.words) {
+        const std::size_t equals = word.find('=');
+        if (equals == std::string::npos || word.find('/') < equals)
+            arguments.files.names.push_back(word);
+        else
+            addStep(steps, metaStep(word.substr(0, equals), meantText(std::string_view(word).substr(equals + 1)),
+                                    arguments.isLenient));
+    }
+    if (steps.empty())
+        throw UsageError("FIELD=VALUE is missing; fields are those that ktfiles meta prints");
+    return steps;
+}
+
+/// Under "info" and "ixml" any name may stand: a file of that name is meant first.
+bool isOpenName(const std::string& word)
+{
+    return word.starts_with("info.") || word.starts_with("ixml.");
+}
+
+std::vector<MetaStep> takeNames(EditArguments& arguments)
+{
+    std::vector<MetaStep> steps;
+    for (const std::string& word : arguments.words) {
+        struct stat status = {};
+        const bool hasSlash = word.find('/') != std::string::npos;
+        const bool isThere = ::lstat(nameMeantBy(word).c_str(), &status) == 0;
+        if (!hasSlash && isEditedField(word) && !(isThere && isOpenName(word)))
+            addStep(steps, metaStep(word, std::nullopt, arguments.isLenient));
+        else if (hasSlash || isThere)
+            arguments.files.names.push_back(word);
+        else // a misspelt field must not pass for a missing file
+            throw UsageError("\"" + printable(word) + "\" is neither a file nor a field to edit" + whyNotEdited(word));
+    }
+    if (steps.empty())
+        throw UsageError("FIELD is missing; fields are those that ktfiles meta prints");
+    return steps;
+}
+
+std::string inWords(const MetaField::Value& value)
+{
+    return std::visit([](const auto& each) { return fmt::format("{}", each); }, value);
+}
+
+std::string inWords(const std::vector<MetaChange>& changes)
+{
+    std::string text;
+    for (const MetaChange& change : changes) {
+        text += (text.empty() ? "" : ", ") + change.field;
+        if (change.to)
+            text += "=" + inWords(*change.to);
+        if (change.from)
+            text += " (was " + inWords(*change.from) + ")";
+    }
+    return text;
+}
+
+void writeRecordOf(JsonWriter& json, const std::string& path, const EditWords& words, const EditOptions& options,
+                   const MetaPlan& plan, const std::string& backup)
+{
+    json.beginObject().member("path", path).member("action", words.action);
+    json.key("changes").beginArray();
+    for (const MetaChange& change : plan.changes) {
+        json.beginObject().member("field", change.field);
+        for (const auto& [key, value] : {std::pair{"from", &change.from}, {"to", &change.to}})
+            if (*value)
+                std::visit([&, name = key](const auto& each) { json.member(name, each); }, **value);
+        json.endObject();
+    }
+    json.endArray().member("dryRun", options.dryRun).knownMember("backup", backup).endObject();
+}
+
+bool editFiles(EditArguments& arguments, const std::vector<MetaStep>& steps, const EditWords& words,
+               const OutputOptions& output)
+{
+    std::vector<std::string> files;
+    if (!reportingRecord(arguments.files.listName(), output, [&] { files = allNames(arguments.files); }))
+        return false;
+    arguments.options.quiet = output.quiet;
+    JsonRecords json(output);
+    bool good = true;
+    for (const std::string& path : files)
+        try {
+            SafeEdit edit(path, arguments.options);
+            const MetaPlan plan = planMetadata(edit.target(), steps, arguments.isLenient);
+            std::string backup;
+            if (!arguments.options.dryRun && !plan.items.empty())
+                backup = edit.apply(EditScope{EditScope::Kind::chunks, plan.ids, false},
+                                    [&](const std::string& copy) { writeMetadata(copy, plan); });
+            const std::string name = shownName(path);
+            if (output.wantsJson()) {
+                writeRecordOf(json.begin(), name, words, arguments.options, plan, shownName(backup));
+                json.end();
+            } else if (!output.quiet) {
+                const std::string what =
+                    plan.items.empty() ? "unchanged"
+                                       : fmt::format("{} {}", arguments.options.dryRun ? words.dryRun : words.done,
+                                                     inWords(plan.changes));
+                Output::standard().print("{}\n",
+                                         printable(fmt::format("{}: {}{}{}", name, what,
+                                                               backup.empty() ? "" : "; backup ", shownName(backup))));
+            }
+        } catch (const Failure& failure) {
+            good = false;
+            if (output.wantsJson())
+                json.addFailure(path, failure.what());
+            reportFailure(path, failure.what());
+        }
+    if (output.wantsJson())
+        json.finish();
+    return good;
+}
+
+bool runSet(EditArguments& arguments, const OutputOptions& output)
+{
+    const std::vector<MetaStep> steps = takeAssignments(arguments);
+    return editFiles(arguments, steps, {"set", "set", "would set"}, output);
+}
+
+bool runRemove(EditArguments& arguments, const OutputOptions& output)
+{
+    const std::vector<MetaStep> steps = takeNames(arguments);
+    return editFiles(arguments, steps, {"remove", "removed", "would remove"}, output);
+}
+
+Verb& declareEdit(CommandLine& commandLine, Verb& meta, const std::string& name, const std::string& description,
+                  const std::string& words, EditArguments& arguments, bool (*run)(EditArguments&, const OutputOptions&))
+{
+    Verb& verb = commandLine.addVerb(
+        name, description, [&commandLine, &arguments, run] { return run(arguments, commandLine.output()); }, &meta);
+    CommandLine::addFiles(verb, arguments.words).describe(words);
+    CommandLine::addFileList(verb, arguments.files);
+    CommandLine::addEditOptions(verb, arguments.options);
+    return verb;
+}
+
+} // namespace
+
+void declareMetaEdits(CommandLine& commandLine, Verb& meta)
+{
+    static EditArguments toSet, toRemove;
+    Verb& set = declareEdit(commandLine, meta, "set", "Set fields of WAVE, AIFF and CAF files; what is not named stays",
+                            "The audio files, and FIELD=VALUE for each field, as in bext.description=Take, "
+                            "bext.timeReference=01:00:00:00@25, cue[new].position=1:02.5",
+                            toSet, runSet);
+    set.addFlag("--lenient", toSet.isLenient,
+                "Take what the standards do not: texts that are not ASCII, other dates, unknown ids");
+    declareEdit(commandLine, meta, "remove", "Remove fields, items of lists, or whole chunks by their group",
+                "The audio files, and the FIELDs to remove, as in info.ISFT, cue[2], bext", toRemove, runRemove);
+}

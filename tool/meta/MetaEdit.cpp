@@ -95,10 +95,11 @@ double MetaStep::decimal() const
     return valueOr0<double>(value);
 }
 
-MetaEdit::MetaEdit(HeldMetadata& held, const std::vector<MetaStep>& steps, bool isLenient)
+MetaEdit::MetaEdit(HeldMetadata& held, const std::vector<MetaStep>& steps, bool isLenient, bool makesNext)
     : held_(held),
       steps_(steps),
-      isLenient_(isLenient)
+      isLenient_(isLenient),
+      makesNext_(makesNext)
 {
 }
 
@@ -196,6 +197,8 @@ std::optional<std::size_t> MetaEdit::itemOf(const MetaStep& step, std::size_t pa
         return newItems_.try_emplace(step.name.upTo(part), count).first->second;
     const auto index = item.number();
     if (index && *index < count)
+        return index;
+    if (index == count && makesNext_ && !step.isRemoval())
         return index;
     if (step.isRemoval())
         return std::nullopt;

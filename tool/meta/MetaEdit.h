@@ -24,8 +24,9 @@ struct MetaStep {
 /// The chunks of one file while steps are applied to them.
 class MetaEdit {
 public:
-    /// The chunks that `held` has are changed. With `isLenient` what a standard does not allow is taken.
-    MetaEdit(HeldMetadata& held, const std::vector<MetaStep>& steps, bool isLenient);
+    /// The chunks that `held` has are changed. With `isLenient` what a standard does not allow is taken; with
+    /// `makesNext` an index that is one beyond the last item stands for a new one, as `[new]` does.
+    MetaEdit(HeldMetadata& held, const std::vector<MetaStep>& steps, bool isLenient, bool makesNext = false);
 
     /// Applies all of them, removals last. Throws Failure.
     void apply();
@@ -86,7 +87,7 @@ private:
 
     HeldMetadata& held_;
     std::vector<MetaStep> steps_;
-    bool isLenient_;
+    bool isLenient_, makesNext_;
     std::int64_t nextOffset_ = -1; // tells new chunks from those of the file
     std::vector<FourCC> touched_;
     std::vector<std::string> removedItems_;

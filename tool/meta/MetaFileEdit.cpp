@@ -113,7 +113,9 @@ std::unique_ptr<AudioFile> openItems(const std::string& path, AudioFile::Permiss
 
 } // namespace
 
-MetaPlan planMetadata(const std::string& path, const std::vector<MetaStep>& steps, bool isLenient)
+namespace {
+
+MetaPlan planInStages(const std::string& path, const MetaStages& stagesFor, bool isLenient, bool makesNext)
 {
     {
         CAudioFileIO file;
@@ -122,16 +124,38 @@ MetaPlan planMetadata(const std::string& path, const std::vector<MetaStep>& step
     MetaPlan plan;
     plan.before = holdMetadata(path);
     plan.after = plan.before;
-    MetaEdit edit(plan.after, steps, isLenient);
-    edit.apply();
-    for (const FourCC id : edit.touched())
+    std::set<FourCC> touched;
+    std::vector<std::string> removedItems;
+    std::vector<MetaStep> steps;
+    for (const std::vector<MetaStep>& stage : stagesFor(plan.before)) {
+        MetaEdit edit(plan.after, stage, isLenient, makesNext);
+        edit.apply();
+        touched.insert(edit.touched().begin(), edit.touched().end());
+        removedItems.insert(removedItems.end(), edit.removedItems().begin(), edit.removedItems().end());
+        steps.insert(steps.end(), stage.begin(), stage.end());
+    }
+    for (const FourCC id : touched)
         addItems(plan, id);
     for (const MetaItemEdit& item : plan.items)
         if (std::ranges::find(plan.ids, item.id) == plan.ids.end())
             plan.ids.push_back(item.id);
     requireRoom(path, plan);
-    plan.changes = changesOf(plan, edit.removedItems(), steps);
+    if (!plan.items.empty())
+        plan.changes = changesOf(plan, removedItems, steps);
     return plan;
+}
+
+} // namespace
+
+MetaPlan planMetadata(const std::string& path, const std::vector<MetaStep>& steps, bool isLenient)
+{
+    return planInStages(
+        path, [&](const HeldMetadata&) { return std::vector<std::vector<MetaStep>>{steps}; }, isLenient, false);
+}
+
+MetaPlan planMetadata(const std::string& path, const MetaStages& stagesFor, bool isLenient)
+{
+    return planInStages(path, stagesFor, isLenient, true);
 }
 
 void writeMetadata(const std::string& path, const MetaPlan& plan)

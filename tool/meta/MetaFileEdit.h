@@ -26,6 +26,11 @@ struct MetaPlan {
 /// Throws Failure.
 MetaPlan planMetadata(const std::string& path, const std::vector<MetaStep>& steps, bool isLenient);
 
+/// Steps that follow from what the file has, in stages: the names of each are those that the one before left. An index
+/// one beyond the last stands for a new item. Throws Failure.
+using MetaStages = std::function<std::vector<std::vector<MetaStep>>(const HeldMetadata& held)>;
+MetaPlan planMetadata(const std::string& path, const MetaStages& stagesFor, bool isLenient);
+
 /// Makes the edit of the file itself, and reads it again. Throws Failure, also when a chunk is then not found as it
 /// should be.
 void writeMetadata(const std::string& path, const MetaPlan& plan);

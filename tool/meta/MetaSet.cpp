@@ -1,10 +1,8 @@
 // ktfiles meta set, and remove.
 #include "tool/meta/MetaCommand.h"
-#include "tool/meta/MetaFileEdit.h"
-#include "tool/shared/access/FileAccess.h"
+#include "tool/meta/MetaEdits.h"
 #include "tool/shared/arguments/CommandLine.h"
 #include "tool/shared/arguments/QuotedText.h"
-#include "tool/shared/output/Failure.h"
 #include "tool/shared/output/JsonRecords.h"
 #include "tool/shared/output/ShownName.h"
 #include "tool/shared/output/Terminal.h"
@@ -19,10 +17,6 @@ struct EditArguments {
     FileArguments files; // those of the list; the others are among the words
     bool isLenient = false;
     EditOptions options;
-};
-
-struct EditWords {
-    const char *action, *done, *dryRun;
 };
 
 std::string meantText(std::string_view text)
@@ -86,78 +80,16 @@ std::vector<MetaStep> takeNames(EditArguments& arguments)
     return steps;
 }
 
-std::string inWords(const MetaField::Value& value)
-{
-    return std::visit([](const auto& each) { return fmt::format("{}", each); }, value);
-}
-
-std::string inWords(const std::vector<MetaChange>& changes)
-{
-    std::string text;
-    for (const MetaChange& change : changes) {
-        text += (text.empty() ? "" : ", ") + change.field;
-        if (change.to)
-            text += "=" + inWords(*change.to);
-        if (change.from)
-            text += " (was " + inWords(*change.from) + ")";
-    }
-    return text;
-}
-
-void writeRecordOf(JsonWriter& json, const std::string& path, const EditWords& words, const EditOptions& options,
-                   const MetaPlan& plan, const std::string& backup)
-{
-    json.beginObject().member("path", path).member("action", words.action);
-    json.key("changes").beginArray();
-    for (const MetaChange& change : plan.changes) {
-        json.beginObject().member("field", change.field);
-        for (const auto& [key, value] : {std::pair{"from", &change.from}, {"to", &change.to}})
-            if (*value)
-                std::visit([&, name = key](const auto& each) { json.member(name, each); }, **value);
-        json.endObject();
-    }
-    json.endArray().member("dryRun", options.dryRun).knownMember("backup", backup).endObject();
-}
-
-bool editFiles(EditArguments& arguments, const std::vector<MetaStep>& steps, const EditWords& words,
+bool editFiles(EditArguments& arguments, const std::vector<MetaStep>& steps, const MetaEditWords& words,
                const OutputOptions& output)
 {
     std::vector<std::string> files;
     if (!reportingRecord(arguments.files.listName(), output, [&] { files = allNames(arguments.files); }))
         return false;
-    arguments.options.quiet = output.quiet;
-    JsonRecords json(output);
-    bool good = true;
+    MetaEdits edits(words, arguments.options, output);
     for (const std::string& path : files)
-        try {
-            SafeEdit edit(path, arguments.options);
-            const MetaPlan plan = planMetadata(edit.target(), steps, arguments.isLenient);
-            std::string backup;
-            if (!arguments.options.dryRun && !plan.items.empty())
-                backup = edit.apply(EditScope{EditScope::Kind::chunks, plan.ids, false},
-                                    [&](const std::string& copy) { writeMetadata(copy, plan); });
-            const std::string name = shownName(path);
-            if (output.wantsJson()) {
-                writeRecordOf(json.begin(), name, words, arguments.options, plan, shownName(backup));
-                json.end();
-            } else if (!output.quiet) {
-                const std::string what =
-                    plan.items.empty() ? "unchanged"
-                                       : fmt::format("{} {}", arguments.options.dryRun ? words.dryRun : words.done,
-                                                     inWords(plan.changes));
-                Output::standard().print("{}\n",
-                                         printable(fmt::format("{}: {}{}{}", name, what,
-                                                               backup.empty() ? "" : "; backup ", shownName(backup))));
-            }
-        } catch (const Failure& failure) {
-            good = false;
-            if (output.wantsJson())
-                json.addFailure(path, failure.what());
-            reportFailure(path, failure.what());
-        }
-    if (output.wantsJson())
-        json.finish();
-    return good;
+        edits.edit(path, [&](const std::string& target) { return planMetadata(target, steps, arguments.isLenient); });
+    return edits.finish();
 }
 
 bool runSet(EditArguments& arguments, const OutputOptions& output)

@@ -1,0 +1,92 @@
+#include "tool/meta/MetaEdits.h"
+
+#include "tool/shared/output/ShownName.h"
+#include "tool/shared/output/Terminal.h"
+
+#include <fmt/format.h>
+
+namespace {
+
+std::string inWords(const MetaField::Value& value)
+{
+    return std::visit([](const auto& each) { return fmt::format("{}", each); }, value);
+}
+
+std::string inWords(const std::vector<MetaChange>& changes)
+{
+    std::string text;
+    for (const MetaChange& change : changes) {
+        text += (text.empty() ? "" : ", ") + change.field;
+        if (change.to)
+            text += "=" + inWords(*change.to);
+        if (change.from)
+            text += " (was " + inWords(*change.from) + ")";
+    }
+    return text;
+}
+
+} // namespace
+
+MetaEdits::MetaEdits(const MetaEditWords& words, EditOptions options, const OutputOptions& output)
+    : words_(words),
+      options_(std::move(options)),
+      output_(output),
+      json_(output)
+{
+    options_.quiet = output.quiet;
+}
+
+void MetaEdits::edit(const std::string& path, const Plan& plan, const std::string& place)
+{
+    try {
+        SafeEdit edit(path, options_);
+        const MetaPlan planned = plan(edit.target());
+        std::string backup;
+        if (!options_.dryRun && !planned.items.empty())
+            backup = edit.apply(EditScope{EditScope::Kind::chunks, planned.ids, false},
+                                [&](const std::string& copy) { writeMetadata(copy, planned); });
+        ++(planned.items.empty() ? unchanged_ : changed_);
+        tell(shownName(path), planned, shownName(backup));
+    } catch (const Failure& failure) {
+        fail(path, place + failure.what());
+    }
+}
+
+void MetaEdits::fail(const std::string& path, const std::string& text)
+{
+    ++failed_;
+    json_.addFailure(path, text);
+    Output::standard().flush(); // what was told so far comes first
+    reportFailure(path, text);
+}
+
+bool MetaEdits::finish()
+{
+    json_.finish();
+    return failed_ == 0;
+}
+
+void MetaEdits::tell(const std::string& path, const MetaPlan& plan, const std::string& backup)
+{
+    if (output_.wantsJson()) {
+        JsonWriter& json = json_.begin();
+        json.beginObject().member("path", path).member("action", words_.action);
+        json.key("changes").beginArray();
+        for (const MetaChange& change : plan.changes) {
+            json.beginObject().member("field", change.field);
+            for (const auto& [key, value] : {std::pair{"from", &change.from}, {"to", &change.to}})
+                if (*value)
+                    std::visit([&, name = key](const auto& each) { json.member(name, each); }, **value);
+            json.endObject();
+        }
+        json.endArray().member("dryRun", options_.dryRun).knownMember("backup", backup).endObject();
+        json_.end();
+    } else if (!output_.quiet) {
+        const std::string what =
+            plan.items.empty()
+                ? "unchanged"
+                : fmt::format("{} {}", options_.dryRun ? words_.dryRun : words_.done, inWords(plan.changes));
+        Output::standard().print(
+            "{}\n", printable(fmt::format("{}: {}{}{}", path, what, backup.empty() ? "" : "; backup ", backup)));
+    }
+}

@@ -106,6 +106,9 @@ class Meta(CommandTest):
             self.assertIn(line, lines)
         self.assertEqual(self.lines("meta", "a.wav", "a.wav", "--only", "FACT")[1], "a.wav\tfact.frames\t100\t0:00:00.002")
         self.assertEqual(list(self.fields("a.wav", "--only", "abcd,info")), ["info.IART", "info.IART[1]", "info.ZzZz", "AbCd"])
+        for group in sorted({re.match(r"\w+", name)[0] for name in FIELDS}):  # as without it, from those chunks alone
+            self.assertEqual(self.fields("a.wav", "--only", group),
+                             {name: value for name, value in FIELDS.items() if re.match(r"\w+", name)[0] == group})
         rows = list(csv.DictReader(io.StringIO(self.run_command("meta", "--csv", "a.wav").stdout.decode(), newline="")))
         self.assertEqual([row["field"] for row in rows], list(FIELDS))
         self.assertEqual(next(row["value"] for row in rows if row["field"] == "cart.tagText"), "text\r\n")

@@ -93,12 +93,18 @@ bool readApplication(const MetaChunk& chunk, const MetaSource&, MetaFields& fiel
 }
 
 constexpr MetaReader kReaders[] = {
-    {fourCC("NAME"), "NAME", readText},       {fourCC("AUTH"), "AUTH", readText},
-    {fourCC("(c) "), "(c)", readText},        {fourCC("ANNO"), "ANNO", readText},
-    {fourCC("COMT"), "comt", readComments},   {fourCC("MARK"), "mark", readMarkers},
-    {fourCC("INST"), "inst", readInstrument}, {fourCC("MIDI"), "midi", readPreview},
-    {fourCC("AESD"), "aesd", readHex},        {fourCC("APPL"), "appl", readApplication},
-    {fourCC("ID3 "), "id3", readID3},         {fourCC("PEAK"), "peak", readPeaks},
+    {fourCC("NAME"), "NAME", readText},
+    {fourCC("AUTH"), "AUTH", readText},
+    {fourCC("(c) "), "(c)", readText},
+    {fourCC("ANNO"), "ANNO", readText},
+    {fourCC("COMT"), "comt", readComments},
+    {fourCC("MARK"), "mark", readMarkers},
+    {fourCC("INST"), "inst", readInstrument, fourCC("MARK")},
+    {fourCC("MIDI"), "midi", readPreview},
+    {fourCC("AESD"), "aesd", readHex},
+    {fourCC("APPL"), "appl", readApplication},
+    {fourCC("ID3 "), "id3", readID3},
+    {fourCC("PEAK"), "peak", readPeaks},
     {fourCC("LGWV"), "lgwv", readPreview},
 };
 

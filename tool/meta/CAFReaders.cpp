@@ -177,12 +177,18 @@ bool readOwn(const MetaChunk& chunk, const MetaSource&, MetaFields& fields)
 }
 
 constexpr MetaReader kReaders[] = {
-    {fourCC("info"), "info", readTexts},      {fourCC("strg"), "strg", readStrings},
-    {fourCC("mark"), "mark", readMarkers},    {fourCC("regn"), "regn", readRegions},
-    {fourCC("inst"), "inst", readInstrument}, {fourCC("chan"), "chan", readChannels},
-    {fourCC("midi"), "midi", readPreview},    {fourCC("umid"), "umid", readHex},
-    {fourCC("ovvw"), "ovvw", readPreview},    {fourCC("peak"), "peak", readPeakPositions},
-    {fourCC("edct"), "edct", readEditCount},  {fourCC("uuid"), "uuid", readOwn},
+    {fourCC("info"), "info", readTexts},
+    {fourCC("strg"), "strg", readStrings},
+    {fourCC("mark"), "mark", readMarkers, fourCC("strg")},
+    {fourCC("regn"), "regn", readRegions, fourCC("strg")},
+    {fourCC("inst"), "inst", readInstrument, fourCC("strg")},
+    {fourCC("chan"), "chan", readChannels},
+    {fourCC("midi"), "midi", readPreview},
+    {fourCC("umid"), "umid", readHex},
+    {fourCC("ovvw"), "ovvw", readPreview},
+    {fourCC("peak"), "peak", readPeakPositions},
+    {fourCC("edct"), "edct", readEditCount},
+    {fourCC("uuid"), "uuid", readOwn},
 };
 
 } // namespace

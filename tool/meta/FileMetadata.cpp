@@ -31,11 +31,15 @@ std::span<const MetaReader> readersOf(const ContainerExtent& extent)
     }
 }
 
+char asciiLower(char c)
+{
+    return c >= 'A' && c <= 'Z' ? static_cast<char>(c - 'A' + 'a') : c;
+}
+
 std::string lowered(std::string_view text)
 {
-    std::string small;
-    for (const char c : text)
-        small += c >= 'A' && c <= 'Z' ? static_cast<char>(c - 'A' + 'a') : c;
+    std::string small(text);
+    std::ranges::transform(small, small.begin(), asciiLower);
     return small;
 }
 
@@ -52,6 +56,32 @@ const MetaReader* readerOf(FourCC id, std::span<const MetaReader> readers)
     return reader == readers.end() ? nullptr : &*reader;
 }
 
+bool isWanted(std::string_view group, const MetaGroups& groups)
+{
+    const auto isGroup = [group](const std::string& wanted) {
+        return std::ranges::equal(group, wanted, {}, asciiLower);
+    };
+    return groups.empty() || std::ranges::any_of(groups, isGroup);
+}
+
+/// Of a LIST only its form says of which group its fields are.
+bool isWanted(FourCC id, const MetaReader* reader, const MetaGroups& groups)
+{
+    if (groups.empty())
+        return true;
+    if (id == fourCC("LIST"))
+        return isWanted("LIST", groups) || isWanted("info", groups) || isWanted("cue", groups);
+    return reader != nullptr ? isWanted(reader->group, groups) : isWanted(groupOf(id), groups);
+}
+
+/// Whether a wanted chunk is read with the help of this one.
+bool isReferredTo(FourCC id, std::span<const MetaReader> readers, const MetaGroups& groups)
+{
+    return std::ranges::any_of(readers, [&](const MetaReader& reader) {
+        return reader.refersTo == id && isWanted(reader.id, &reader, groups);
+    });
+}
+
 /// How long a chunk may be that is held whole.
 std::int64_t mostOf(const MetaReader& reader)
 {
@@ -63,7 +93,7 @@ std::int64_t mostOf(const MetaReader& reader)
 }
 
 /// The chunks that may be metadata, in the order of the file; with `extent` of the container.
-MetaSource collect(CAudioFileIO& file, ContainerExtent& extent)
+MetaSource collect(CAudioFileIO& file, const MetaGroups& groups, ContainerExtent& extent)
 {
     MetaSource source;
     std::int32_t readStatus = kStatusOK;
@@ -72,12 +102,15 @@ MetaSource collect(CAudioFileIO& file, ContainerExtent& extent)
         [&](const ChunkEntry& entry) {
             if (std::ranges::find(kStructure, entry.id) != kStructure.end())
                 return true;
+            const std::span<const MetaReader> readers = readersOf(extent);
+            const MetaReader* const reader = readerOf(entry.id, readers);
+            if (!isWanted(entry.id, reader, groups) && !isReferredTo(entry.id, readers, groups))
+                return true;
             MetaChunk& chunk = source.chunks.emplace_back();
             chunk.id = entry.id;
             chunk.offset = entry.offset;
             chunk.size = std::max<std::int64_t>(entry.size, 0);
             const std::int64_t there = std::clamp<std::int64_t>(extent.fileLength - entry.body, 0, chunk.size);
-            const MetaReader* const reader = readerOf(entry.id, readersOf(extent));
             chunk.isHeld = reader != nullptr && there <= std::min(room, mostOf(*reader));
             chunk.body.resize(static_cast<std::size_t>(chunk.isHeld ? there : std::min(there, kHead)));
             room -= std::ssize(chunk.body);
@@ -96,9 +129,11 @@ MetaSource collect(CAudioFileIO& file, ContainerExtent& extent)
 }
 
 void readChunk(const MetaChunk& chunk, std::span<const MetaReader> readers, const MetaSource& source,
-               MetaFields& fields)
+               const MetaGroups& groups, MetaFields& fields)
 {
     const MetaReader* const reader = readerOf(chunk.id, readers);
+    if (!isWanted(chunk.id, reader, groups))
+        return;
     if (chunk.id == fourCC("LIST")) // its reader says which
         fields.enterShared(chunk, "LIST");
     else
@@ -107,11 +142,11 @@ void readChunk(const MetaChunk& chunk, std::span<const MetaReader> readers, cons
         fields.preview("", chunk.body, static_cast<std::uint64_t>(chunk.size));
 }
 
-HeldMetadata holdChunks(CAudioFileIO& file)
+HeldMetadata holdChunks(CAudioFileIO& file, const MetaGroups& groups)
 {
     ContainerExtent extent;
     HeldMetadata held;
-    held.source = collect(file, extent);
+    held.source = collect(file, groups, extent);
     held.container = extent.id;
     held.readers = readersOf(extent);
     held.sampleRate = file.Info().exactSampleRate;
@@ -119,38 +154,45 @@ HeldMetadata holdChunks(CAudioFileIO& file)
     return held;
 }
 
-FileMetadata readChunks(CAudioFileIO& file)
+/// Headers and the chunks beside them come in one piece.
+void readAhead(CAudioFileIO& file)
 {
-    const HeldMetadata held = holdChunks(file);
-    return {held.container, fieldsOf(held)};
+    constexpr long size = 8192;
+    file.SetCache(size);
 }
 
 } // namespace
 
-HeldMetadata holdMetadata(const std::string& path)
+HeldMetadata holdMetadata(const std::string& path, const MetaGroups& groups)
 {
     CAudioFileIO file;
+    readAhead(file);
     openChunks(file, path);
-    return holdChunks(file);
+    return holdChunks(file, groups);
 }
 
-std::vector<MetaField> fieldsOf(const HeldMetadata& held)
+std::vector<MetaField> fieldsOf(const HeldMetadata& held, const MetaGroups& groups)
 {
     MetaFields fields(held.sampleRate);
     for (const MetaChunk& chunk : held.source.chunks)
-        readChunk(chunk, held.readers, held.source, fields);
+        readChunk(chunk, held.readers, held.source, groups, fields);
     return fields.take();
 }
 
 FileMetadata readMetadata(const std::string& path, const MetaGroups& groups)
 {
     CAudioFileIO file;
+    readAhead(file);
     requireOK(file.OpenForChunks(referenceTo(path), 0));
-    FileMetadata metadata = file.HasChunks() ? readChunks(file) : readTags(file, path);
+    FileMetadata metadata;
+    if (file.HasChunks()) {
+        const HeldMetadata held = holdChunks(file, groups);
+        metadata = {held.container, fieldsOf(held, groups)};
+    } else {
+        metadata = readTags(file, path);
+    }
     if (!groups.empty())
-        std::erase_if(metadata.fields, [&](const MetaField& field) {
-            return std::ranges::find(groups, lowered(field.group)) == groups.end();
-        });
+        std::erase_if(metadata.fields, [&](const MetaField& field) { return !isWanted(field.group, groups); });
     return metadata;
 }
 

@@ -17,12 +17,12 @@ struct HeldMetadata {
     std::int64_t frames = -1; // of the sound; below 0 unknown
 };
 
-/// Throws as readMetadata does.
-HeldMetadata holdMetadata(const std::string& path);
-std::vector<MetaField> fieldsOf(const HeldMetadata& held);
-
 /// Which groups of fields are wanted, in small letters; empty: all.
 using MetaGroups = std::vector<std::string>;
+
+/// Chunks that no wanted field is made of are not read. Throws as readMetadata does.
+HeldMetadata holdMetadata(const std::string& path, const MetaGroups& groups = {});
+std::vector<MetaField> fieldsOf(const HeldMetadata& held, const MetaGroups& groups = {});
 
 /// The chunks of WAVE, RF64, BW64, RIFX, Wave64, AIFF, AIFC and CAF files, and the tags of others; throws Failure.
 /// Chunks that say how samples are coded, and room that is not used, are left out; of those that nobody here knows the

@@ -56,11 +56,11 @@ void tellValue(const MetaField& field, Record& record)
     record.member("value", valueText(field));
 }
 
-/// The keys of JSON and the columns of CSV; `sink` is either's record.
+/// The keys of JSON and the columns of CSV; `sink` is either's record, `name` the field's.
 template <class Sink>
-void tell(const MetaField& field, Sink& sink)
+void tell(const MetaField& field, const std::string& name, Sink& sink)
 {
-    sink.member("field", field.fullName());
+    sink.member("field", name);
     tellValue(field, sink);
     sink.knownMember("words", field.words).knownMember("seconds", field.seconds);
     sink.knownMember("size", field.byteSize).knownMember("ascii", field.ascii);
@@ -120,7 +120,9 @@ private:
             json.member("container", fourCCText(metadata.container));
         json.key("fields").beginArray();
         for (const MetaField& field : metadata.fields) {
-            tell(field, json.newLine().beginObject());
+            name_.clear();
+            field.appendFullName(name_);
+            tell(field, name_, json.newLine().beginObject());
             json.endObject();
         }
         json.endArrayOfLines().endObject();
@@ -135,7 +137,7 @@ private:
             csv_.add(file);
         for (const MetaField& field : metadata.fields) {
             Record record = file;
-            tell(field, record);
+            tell(field, field.fullName(), record);
             csv_.add(record);
         }
     }
@@ -189,6 +191,7 @@ private:
     bool several_;
     bool isFirst_ = true;
     int width_ = 0;
+    std::string name_; // of the field that is written
     Output& output_ = Output::standard();
     JsonRecords json_;
     CsvRecords csv_;

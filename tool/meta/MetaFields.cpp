@@ -2,17 +2,27 @@
 
 #include "tool/shared/output/DisplayWidth.h"
 
-#include <fmt/format.h>
-
 #include <algorithm>
+#include <charconv>
 #include <cmath>
+#include <utility>
 
 namespace {
 
 constexpr std::size_t kPreviewSize = 32;
 
+bool isASCII(std::string_view text)
+{
+    unsigned char bits = 0;
+    for (const char c : text)
+        bits |= static_cast<unsigned char>(c);
+    return bits < 0x80;
+}
+
 bool isUTF8(std::string_view text)
 {
+    if (isASCII(text)) // most are
+        return true;
     constexpr char32_t replacement = 0xFFFD; // which may be there itself, in three bytes
     while (!text.empty()) {
         const std::size_t before = text.size();
@@ -39,19 +49,57 @@ std::string fromLatin1(std::string_view bytes)
 
 std::string hexText(BytesView bytes)
 {
+    constexpr char digits[] = "0123456789abcdef";
     std::string text;
+    text.reserve(2 * bytes.size());
     for (const std::byte byte : bytes)
-        fmt::format_to(std::back_inserter(text), "{:02x}", std::to_integer<unsigned>(byte));
+        (text += digits[std::to_integer<unsigned>(byte) >> 4]) += digits[std::to_integer<unsigned>(byte) & 15];
     return text;
+}
+
+std::size_t hashOf(const MetaField& field)
+{
+    constexpr std::hash<std::string_view> hash;
+    return hash(field.place) * 31 + hash(field.name);
 }
 
 } // namespace
 
+std::uint32_t MetaNameCounts::add(const std::vector<MetaField>& fields, std::size_t index)
+{
+    if (2 * (taken_ + 1) > slots_.size()) {
+        constexpr std::size_t least = 128;
+        const std::vector<Slot> before = std::exchange(slots_, std::vector<Slot>(std::max(least, 2 * slots_.size())));
+        for (const Slot& slot : before)
+            if (slot.field != 0)
+                slotFor(fields, fields[slot.field - 1]) = slot;
+    }
+    Slot& slot = slotFor(fields, fields[index]);
+    if (slot.field == 0) {
+        slot.field = static_cast<std::uint32_t>(index + 1);
+        ++taken_;
+    }
+    return slot.count++;
+}
+
+/// That of the field's name, or the free one where it belongs.
+MetaNameCounts::Slot& MetaNameCounts::slotFor(const std::vector<MetaField>& fields, const MetaField& field)
+{
+    for (std::size_t at = hashOf(field);; ++at) {
+        Slot& slot = slots_[at & (slots_.size() - 1)];
+        if (slot.field == 0)
+            return slot;
+        const MetaField& first = fields[slot.field - 1];
+        if (first.name == field.name && first.place == field.place)
+            return slot;
+    }
+}
+
 void MetaFields::enter(const MetaChunk& chunk, std::string_view group)
 {
     enterShared(chunk, group);
-    if (const int count = places_[here_.group]++; count != 0)
-        here_.place = fmt::format("{}[{}]", group, count);
+    if (const std::size_t count = places_[here_.group]++; count != 0)
+        appendIndex(here_.place, count);
 }
 
 void MetaFields::enterShared(const MetaChunk& chunk, std::string_view group)
@@ -67,8 +115,8 @@ MetaField& MetaFields::add(std::string_view name, MetaField::Value value)
     MetaField& field = fields_.emplace_back(here_);
     field.name = isUTF8(name) ? std::string(name) : fromLatin1(name); // keys are texts of the file too
     field.value = std::move(value);
-    if (const int count = names_[field.fullName()]++; count != 0)
-        field.name += fmt::format("[{}]", count);
+    if (const std::uint32_t count = names_.add(fields_, fields_.size() - 1); count != 0)
+        appendIndex(field.name, count);
     return field;
 }
 
@@ -123,7 +171,18 @@ void MetaFields::missing(std::uint64_t count)
         number("missing", count, "stated, and not there");
 }
 
+void appendIndex(std::string& text, std::size_t index)
+{
+    char digits[20];
+    text += '[';
+    text.append(digits, std::to_chars(digits, std::end(digits), index).ptr);
+    text += ']';
+}
+
 std::string itemName(std::string_view name, std::size_t index)
 {
-    return fmt::format("{}[{}].", name, index);
+    std::string item(name);
+    appendIndex(item, index);
+    item += '.';
+    return item;
 }

@@ -39,14 +39,43 @@ struct MetaField {
     std::int64_t offset = 0;
 
     /// "bext.description", "cue[3].label".
-    std::string fullName() const { return place + (name.empty() || name.front() == '[' ? "" : ".") + name; }
+    std::string fullName() const
+    {
+        std::string text;
+        appendFullName(text);
+        return text;
+    }
+    void appendFullName(std::string& text) const
+    {
+        text += place;
+        if (!name.empty() && name.front() != '[')
+            text += '.';
+        text += name;
+    }
+};
+
+/// How many fields of a place have had a name, found by hashes that need no copies of the names.
+class MetaNameCounts {
+public:
+    /// Counts one more field, `index` of `fields`, under the name that it has now; returns how many had it before.
+    std::uint32_t add(const std::vector<MetaField>& fields, std::size_t index);
+
+private:
+    struct Slot {
+        std::uint32_t field = 0; // the first of the name, counted from 1; 0: free
+        std::uint32_t count = 0;
+    };
+    Slot& slotFor(const std::vector<MetaField>& fields, const MetaField& field);
+
+    std::vector<Slot> slots_; // a power of two, at most half of them taken
+    std::size_t taken_ = 0;
 };
 
 /// Collects fields, and gives those of the same name different ones: "info.IART", "info.IART[1]".
 class MetaFields {
 public:
     /// The rate tells the time of numbers of frames; 0 where it is not known.
-    explicit MetaFields(double sampleRate) : sampleRate_(sampleRate) {}
+    explicit MetaFields(double sampleRate) : sampleRate_(sampleRate) { fields_.reserve(kUsualFields); }
 
     /// From now on fields are of this chunk.
     void enter(const MetaChunk& chunk, std::string_view group);
@@ -81,13 +110,18 @@ public:
     std::vector<MetaField> take() { return std::move(fields_); }
 
 private:
+    static constexpr std::size_t kUsualFields = 64;
+
     MetaField& add(std::string_view name, MetaField::Value value);
 
     double sampleRate_;
     MetaField here_; // the parts that fields share
-    std::map<std::string, int, std::less<>> places_, names_;
+    std::map<std::string, std::size_t> places_;
+    MetaNameCounts names_;
     std::vector<MetaField> fields_;
 };
 
+/// `[index]`.
+void appendIndex(std::string& text, std::size_t index);
 /// `name[index].` ahead of the fields of one item of several.
 std::string itemName(std::string_view name, std::size_t index);

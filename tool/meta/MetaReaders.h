@@ -36,6 +36,7 @@ struct MetaReader {
     FourCC id = 0;
     std::string_view group; // ahead of the names of its fields
     MetaRead read = nullptr;
+    FourCC refersTo = 0; // the id of the chunk in which it looks up what its own says in numbers
 };
 
 std::span<const MetaReader> waveReaders(); // of RIFF, RF64, BW64, RIFX and Wave64

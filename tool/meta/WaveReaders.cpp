@@ -288,16 +288,26 @@ bool readFact(const MetaChunk& chunk, const MetaSource& source, MetaFields& fiel
 }
 
 constexpr MetaReader kReaders[] = {
-    {fourCC("bext"), "bext", readBroadcast}, {fourCC("iXML"), "ixml", readIXML},
-    {fourCC("LIST"), "LIST", readList},      {fourCC("cue "), "cue", readCues},
-    {fourCC("smpl"), "smpl", readSampler},   {fourCC("inst"), "inst", readInstrument},
-    {fourCC("acid"), "acid", readAcid},      {fourCC("strc"), "strc", readPreview},
-    {fourCC("cart"), "cart", readCart},      {fourCC("chna"), "chna", readTracks},
-    {fourCC("axml"), "axml", readADM},       {fourCC("fact"), "fact", readFact},
-    {fourCC("PEAK"), "peak", readPeaks},     {fourCC("LGWV"), "lgwv", readPreview},
-    {fourCC("MD5 "), "md5", readHex},        {fourCC("UMID"), "umid", readHex},
-    {fourCC("umid"), "umid", readHex},       {fourCC("_PMX"), "xmp", readText},
-    {fourCC("id3 "), "id3", readID3},        {fourCC("ID3 "), "id3", readID3},
+    {fourCC("bext"), "bext", readBroadcast},
+    {fourCC("iXML"), "ixml", readIXML},
+    {fourCC("LIST"), "LIST", readList, fourCC("cue ")},
+    {fourCC("cue "), "cue", readCues},
+    {fourCC("smpl"), "smpl", readSampler},
+    {fourCC("inst"), "inst", readInstrument},
+    {fourCC("acid"), "acid", readAcid},
+    {fourCC("strc"), "strc", readPreview},
+    {fourCC("cart"), "cart", readCart},
+    {fourCC("chna"), "chna", readTracks},
+    {fourCC("axml"), "axml", readADM},
+    {fourCC("fact"), "fact", readFact},
+    {fourCC("PEAK"), "peak", readPeaks},
+    {fourCC("LGWV"), "lgwv", readPreview},
+    {fourCC("MD5 "), "md5", readHex},
+    {fourCC("UMID"), "umid", readHex},
+    {fourCC("umid"), "umid", readHex},
+    {fourCC("_PMX"), "xmp", readText},
+    {fourCC("id3 "), "id3", readID3},
+    {fourCC("ID3 "), "id3", readID3},
 };
 
 } // namespace

@@ -4,32 +4,43 @@
 
 #include <fmt/format.h>
 
-#include <memory>
+#include <algorithm>
+#include <deque>
 
 namespace {
 
 struct Element {
     std::string name;
-    std::string text;
+    std::string text; // from its first character that is no blank on
     std::vector<std::pair<std::string, std::string>> attributes;
-    std::vector<std::unique_ptr<Element>> children;
+    std::size_t depth = 0;              // 0 of the root
+    std::size_t index = 0;              // among those of its name in the same parent
+    const std::size_t* likes = nullptr; // how many those are
+    bool isInList = false;              // its parent's name says so
 };
+
+constexpr std::string_view kBlanks = " \t\r\n";
 
 /// Keeps a document's elements; stops at more of them, or deeper ones, than fields are good for.
 class TreeHandler : public platform::XMLHandler {
 public:
-    static constexpr int kMostElements = 100'000;
+    static constexpr std::size_t kMostElements = 100'000;
     static constexpr std::size_t kLongestPath = 1000;
 
-    TreeHandler() { open_.push_back(&document); }
     void watch(platform::XMLParser& parser) { parser_ = &parser; }
     void startElement(std::string_view name, const platform::XMLAttributes& attributes) override
     {
         pathLength_ += name.size();
-        if (++count_ > kMostElements || pathLength_ > kLongestPath)
+        if (elements.size() == kMostElements || pathLength_ > kLongestPath)
             return parser_->abort();
-        Element& element = *open_.back()->children.emplace_back(std::make_unique<Element>());
+        Element& element = elements.emplace_back();
         element.name = name;
+        element.depth = open_.size();
+        element.isInList = !open_.empty() && open_.back()->name.ends_with("_LIST");
+        const Element* const parent = open_.empty() ? nullptr : open_.back();
+        std::size_t& likes = likes_[{parent, element.name}];
+        element.index = likes++;
+        element.likes = &likes;
         for (const platform::XMLAttribute& attribute : attributes)
             element.attributes.emplace_back(attribute.name, attribute.value);
         open_.push_back(&element);
@@ -39,15 +50,21 @@ public:
         pathLength_ -= name.size();
         open_.pop_back();
     }
-    void characters(std::string_view text) override { open_.back()->text += text; }
+    void characters(std::string_view text) override
+    {
+        std::string& all = open_.back()->text;
+        if (all.empty())
+            text.remove_prefix(std::min(text.find_first_not_of(kBlanks), text.size()));
+        all += text;
+    }
 
-    Element document; // whose one child is the root
+    std::deque<Element> elements; // in the order in which they begin; they stay where they are
 
 private:
     platform::XMLParser* parser_ = nullptr;
     std::vector<Element*> open_;
-    int count_ = 0;
-    std::size_t pathLength_ = 0; // of the names of the open elements
+    std::map<std::pair<const Element*, std::string_view>, std::size_t> likes_; // by parent and name
+    std::size_t pathLength_ = 0;                                               // of the names of the open elements
 };
 
 /// Writers fill chunks up with NULs.
@@ -64,27 +81,31 @@ bool parse(BytesView bytes, TreeHandler& handler)
     return parser.parse();
 }
 
-std::string_view trimmed(std::string_view text)
+/// Of several elements of a name each has its index, and in a list each always.
+bool hasIndex(const Element& element)
 {
-    constexpr std::string_view blanks = " \t\r\n";
-    const std::size_t begin = text.find_first_not_of(blanks);
-    return begin == std::string_view::npos ? "" : text.substr(begin, text.find_last_not_of(blanks) + 1 - begin);
+    return (*element.likes > 1 || element.isInList) && !element.name.ends_with("_COUNT");
 }
 
-/// Of several elements of a name each has its index, and in a list each always.
-void addElements(const Element& parent, const std::string& path, MetaFields& fields)
+/// The root is the document, and no part of a path.
+void addElements(const std::deque<Element>& elements, MetaFields& fields)
 {
-    std::map<std::string_view, int> total, count;
-    for (const auto& child : parent.children)
-        ++total[child->name];
-    for (const auto& child : parent.children) {
-        std::string name = path + child->name;
-        if (const int index = count[child->name]++; total[child->name] > 1 || parent.name.ends_with("_LIST"))
-            name += child->name.ends_with("_COUNT") ? "" : fmt::format("[{}]", index);
-        for (const auto& [attribute, value] : child->attributes)
-            fields.text(name + ".@" + attribute, value);
-        fields.text(name, trimmed(child->text));
-        addElements(*child, name + ".", fields);
+    std::string path;
+    std::vector<std::size_t> ends; // of the path of the element that is open at each depth
+    for (const Element& element : elements) {
+        ends.resize(element.depth + 1);
+        path.resize(element.depth == 0 ? 0 : ends[element.depth - 1]);
+        if (element.depth != 0) {
+            if (!path.empty())
+                path += '.';
+            path += element.name;
+            if (hasIndex(element))
+                appendIndex(path, element.index);
+        }
+        ends.back() = path.size();
+        for (const auto& [attribute, value] : element.attributes)
+            fields.text(path + (path.empty() ? "@" : ".@") + attribute, value);
+        fields.text(path, std::string_view(element.text).substr(0, element.text.find_last_not_of(kBlanks) + 1));
     }
 }
 
@@ -95,7 +116,7 @@ bool readIXML(const MetaChunk& chunk, const MetaSource& source, MetaFields& fiel
     TreeHandler handler;
     if (!parse(chunk.body, handler))
         return readText(chunk, source, fields);
-    addElements(*handler.document.children.front(), "", fields);
+    addElements(handler.elements, fields);
     return true;
 }
 

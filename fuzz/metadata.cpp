@@ -14,6 +14,7 @@
 #include "audiofile/metadata/InfoList.h"
 #include "audiofile/metadata/InstrumentChunk.h"
 #include "audiofile/metadata/MarkerList.h"
+#include "audiofile/metadata/PlaylistChunk.h"
 #include "audiofile/metadata/SamplerChunk.h"
 
 #include <cstdlib>
@@ -94,6 +95,8 @@ constexpr void (*kLayouts[])(BytesView) = {
     isWrittenAsRead<AIFFInstrumentChunk>,
     isWrittenAsRead<CueList, little>,
     isWrittenAsRead<CueList, big>,
+    isWrittenAsRead<PlaylistChunk, little>,
+    isWrittenAsRead<PlaylistChunk, big>,
     isWrittenAsRead<InfoList, little>,
     isWrittenAsRead<InfoList, big>,
     isWrittenAsRead<AssociatedDataList, little>,

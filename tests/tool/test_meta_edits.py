@@ -94,6 +94,8 @@ class MetaEdits(CommandTest):
             ("bext.timeReference=00:01:00;00@29.97", "no such drop-frame code", False), ("bext.timeReference=00:00:00:25@25", "a time code such as", False),
             ("bext.timeReference=00:00:00;00@25", "only 29.97 and 59.94", False), ("bext.descripton=x", 'did you mean "bext.description"?', False),
             ("cue[0].lable=x", 'did you mean "cue[N].label"?', False), ("inst.gain=3", "inst is only read", False), ("acid.tempo=fast", "a number from", False),
+            ("bext[new].originator=x", '"new" is no index here; [0] is the first', False), ("cue[x].label=x", '"x" is no index', False),
+            ("smpl.loop[newer].start=1", '"newer" is no index', False), ("cue[new]=", '"new" is no index', False),
             ("smpl.midiUnityNote=128", "from 0 to 127", False), ("cue[0]=3", "cannot be set, only removed", False),
         ]
         files = [  # of one file
@@ -103,7 +105,8 @@ class MetaEdits(CommandTest):
             ("info.IARTT=x", 'did you mean "IART"?', False), ("info.XXXX=x", "no registered id", True), ("mark[0].name=x", "no field of WAVE files", False),
             ("ixml.USER=x", "there are 2, ixml.USER[0] to [1]", False), ("ixml.TRACK_LIST=x", "it holds elements", False),
             ("ixml.1x=x", "can be no name of an element", False), ("ixml.PROJECT=\x01", "no control characters", False),
-            ("bext[2].originator=x", "there are not so many", False),
+            ("bext[2].originator=x", "the last is bext[0]", False), ("cart[1].title=x", "it has no cart", False), ("cue[id 7].label=x", "no point of this id", False),
+            ("cue[0].position=", "always there; what goes is cue[0]", False),
         ]
         for assignment, text, is_lenient in usage + files:
             with self.subTest(assignment):
@@ -116,11 +119,77 @@ class MetaEdits(CommandTest):
         for arguments in (["set", "a.wav"], ["remove", "a.wav"], ["remove", "a.wav", "bext.descr"], ["set", "a.wav", "bext.version=1", "bext.version=2"]):
             self.failure("meta", *arguments, status=2)
         self.assertEqual(path.read_bytes(), original)
-        # Others: read only.
-        for name, content in (("b.wav", b"RIFX" + struct.pack(">I", 28) + b"WAVE" + chunk(b"fmt ", struct.pack(">HHIIHH", 1, 1, 8000, 16000, 2, 16), ">")),
-                              ("c.txt", b"no sound")):
-            self.write(name, content)
-            self.failure("meta", "set", name, "bext.originator=x")
+
+    def test_files_of_other_kinds_are_only_read(self):
+        self.encoded("a.wav")
+        for name, *arguments in (["a.mp3"], ["a.flac"], ["a.ogg"], ["a.opus"], ["a.m4a"], ["a.wv"], ["a.tta"], ["a.wma"], ["a.aac"], ["a.w64"], ["a.au"]):
+            subprocess.run(["ffmpeg", "-v", "error", "-i", "a.wav", name], check=True, cwd=self.folder)
+        self.write("a.ape", b"MAC \x96\x0f" + bytes(200))
+        self.write("x.wav", b"RIFX" + struct.pack(">I", 28) + b"WAVE" + chunk(b"fmt ", struct.pack(">HHIIHH", 1, 1, 8000, 16000, 2, 16), ">") + chunk(b"data", b""))
+        self.write("a.rx2", b"CAT \0\0\0\x0cREX2HEAD" + bytes(4))
+        (self.folder / "mp3").write_bytes((self.folder / "a.mp3").read_bytes())
+        for path in sorted(self.folder.iterdir()):
+            content = path.read_bytes()
+            if path.name != "a.wav":
+                with self.subTest(path.name):
+                    self.assertEqual(self.failure("meta", "set", path.name, "info.IART=x").strip(), f"ktfiles: {path.name}: metadata of its kind of file is only "
+                                     "read; that of WAVE, RF64, BW64, AIFF, AIFC and CAF files is edited")
+                    self.assertEqual(path.read_bytes(), content)
+        self.assertIn("id3v2 is only read", self.failure("meta", "set", "a.mp3", "id3v2.TIT2=x", status=2))
+        self.write("c.txt", b"no sound")
+        self.assertIn("no audio", self.failure("meta", "set", "c.txt", "info.IART=x"))
+
+    def test_what_is_said_of_a_point_follows_its_id_and_goes_with_it(self):
+        def said(verse, other=9):
+            """Of two points: names, remarks, ranges, a file, a playlist, and loops."""
+            items = lambda i: chunk(b"ltxt", struct.pack("<II4s8x", i, 4, b"rgn ")) + chunk(b"file", struct.pack("<II", i, 0) + b"x")
+            texts = lambda i: chunk(b"labl", struct.pack("<I", i) + b"verse\0") + chunk(b"note", struct.pack("<I", i) + b"n\0")
+            return (b"adtl" + texts(verse) + items(verse) + texts(other), struct.pack("<10I", 3, verse, 4, 1, other, 5, 1, verse, 6, 2),
+                    SAMPLER[:28] + struct.pack("<2I", 2, 0) + struct.pack("<12I", verse, 1, 10, 90, 0, 3, other, 1, 10, 90, 0, 3))
+
+        def content(points, adtl, plst, smpl):
+            return wave(chunk(b"cue ", points), chunk(b"LIST", adtl), chunk(b"plst", plst), chunk(b"smpl", smpl))
+        path = self.write("a.wav", content(CUES, *said(5)))
+        changes = self.changes("set", "a.wav", "--in-place", "cue[0].id=7")
+        self.assertEqual(path.read_bytes(), content(struct.pack("<I", 2) + point(7, 48) + point(9, 96), *said(7)))
+        self.assertEqual(changes, {"cue[0].id": (5, 7), "cue.file": (struct.pack("<II", 5, 0).hex() + "78", struct.pack("<II", 7, 0).hex() + "78"), "smpl.loop[0].cueId": (5, 7), "plst.segment[0].cueId": (5, 7), "plst.segment[2].cueId": (5, 7)})
+        # A loop that a step names is as that says.
+        path.write_bytes(content(CUES, *said(5)))
+        self.assertEqual(self.changes("set", "a.wav", "cue[0].id=7", "smpl.loop[0].cueId=5")["cue[0].id"], (5, 7))
+        self.assertEqual(self.fields("a.wav")["smpl.loop[0].cueId"], 5)
+        # Removed: names, remarks, range, segments; the loop has places of its own, and nobody sees the file in the list.
+        path.write_bytes(content(CUES, *said(5)))
+        changes = self.changes("remove", "a.wav", "cue[0]")
+        self.assertEqual({name for name in changes if name.startswith("cue")},
+                         {"cue[0].id", "cue[0].position", "cue[0].label", "cue[0].note", "cue[0].length", "cue[0].purpose"} | {"cue[0].playlistPosition"} & set(changes))
+        self.assertIn("plst.segment[2].cueId", changes)
+        adtl, plst, smpl = said(5)
+        self.assertEqual([self.body("a.wav", name) for name in (b"LIST", b"plst", b"smpl")],
+                         [adtl[:4] + chunk(b"file", struct.pack("<II", 5, 0) + b"x") + adtl[-32:], struct.pack("<4I", 1, 9, 5, 1), smpl])
+        # A new point takes no id that something stray is said of, and none is made one of it.
+        self.write("a.wav", content(struct.pack("<I", 1) + point(4, 48), *said(5, 6)))
+        self.run_command("meta", "set", "a.wav", "cue[new].position=3")
+        self.assertEqual(self.fields("a.wav")["cue[1].id"], 7)
+        self.run_command("meta", "set", "a.wav", "cue[1].id=5")  # nothing was said of 7, so that what is said of 5 finds its point
+        self.assertEqual(self.fields("a.wav")["cue[1].label"], "verse")
+        self.assertIn("remove cue[id 6] first", self.failure("meta", "set", "a.wav", "cue[1].id=6"))
+        self.run_command("meta", "remove", "a.wav", "cue[id 6]")
+        self.run_command("meta", "set", "a.wav", "cue[1].id=6")
+        # Of two points of one id the first is meant, as it is shown.
+        for verb, left in ((["remove", "cue[1]"], "verse"), (["remove", "cue[0]"], None), (["set", "cue[1].id=8"], "verse")):
+            self.write("a.wav", content(struct.pack("<I", 2) + point(5, 48) + point(5, 96), *said(5)))
+            self.run_command("meta", verb[0], "a.wav", verb[1])
+            self.assertEqual(self.fields("a.wav").get("cue[0].label"), left, verb)
+        # Of AIFF: comments, and the loops of "INST".
+        marks = struct.pack(">HhI", 2, 1, 10) + b"\2in\0" + struct.pack(">hI", 2, 40) + b"\3out"
+        chunks = (b"COMT", struct.pack(">HIhH", 1, 9, 2, 2) + b"hi"), (b"INST", bytes([60, 0, 0, 127, 1, 127]) + struct.pack(">7h", 0, 1, 1, 2, 0, 2, 2))
+        self.write("a.aiff", aiff((b"MARK", marks), *chunks))
+        self.assertEqual(self.changes("set", "a.aiff", "mark[1].id=7"), {"mark[1].id": (2, 7), "comt[0].marker": (2, 7), "inst.sustainLoop.endMarker": (2, 7)})
+        self.assertEqual(self.body("a.aiff", b"INST")[8:], struct.pack(">6h", 1, 1, 7, 0, 2, 2))
+        for names in (["mark[1]"], ["mark"]):
+            self.write("b.aiff", (self.folder / "a.aiff").read_bytes())
+            changes = self.changes("remove", "b.aiff", *names)
+            self.assertEqual((changes["inst.sustainLoop.mode"], changes["comt[0].marker"][0]), ((1, 0), 7), changes)
 
     def test_versions_of_bext_follow_its_fields(self):
         self.write("a.wav", wave())
@@ -147,7 +216,7 @@ class MetaEdits(CommandTest):
         self.assertEqual(self.body("a.wav", b"LIST", 1), b"adtl" + chunk(b"labl", struct.pack("<I", 9) + b"chorus\0") + ADTL[4 + 18:] +
                          chunk(b"labl", struct.pack("<I", 10) + b"third\0") + chunk(b"ltxt", struct.pack("<II4s8x", 10, 4, b"rgn ")))
         self.assertEqual(self.body("a.wav", b"smpl"), struct.pack("<9I", 0, 0, 20833, 61, 0, 25, 0, 2, 3) +
-                         struct.pack("<12I", 9, 1, 10, 91, 0, 3, 10, 0, 1, 2, 0, 0) + b"abc")
+                         struct.pack("<12I", 9, 1, 10, 91, 0, 3, 11, 0, 1, 2, 0, 0) + b"abc")
         self.assertEqual(self.body("a.wav", b"acid"), struct.pack("<IHHfIHHf", 2, 63, 0x8000, 0, 8, 4, 3, 100.25))
         self.assertEqual(self.body("a.wav", b"cart"), CART[:4] + b"T".ljust(64, b"\0") + CART[68:692] + b"EOD " + struct.pack("<I", 50) + CART[700:2048] +
                          b"one\r\n\0")

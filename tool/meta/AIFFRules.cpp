@@ -1,7 +1,10 @@
 // How fields of AIFF and AIFC are set.
+#include "audiofile/metadata/AIFFInstrumentChunk.h"
 #include "audiofile/metadata/CommentList.h"
 #include "audiofile/metadata/MarkerList.h"
 #include "tool/meta/MetaEdit.h"
+
+#include <fmt/format.h>
 
 #include <algorithm>
 #include <ctime>
@@ -9,7 +12,8 @@
 
 namespace {
 
-constexpr FourCC kAnnotation = fourCC("ANNO"), kComments = fourCC("COMT"), kMarkers = fourCC("MARK");
+constexpr FourCC kAnnotation = fourCC("ANNO"), kComments = fourCC("COMT"), kMarkers = fourCC("MARK"),
+                 kInstrument = fourCC("INST");
 constexpr double kNoLimit = 1e9;
 constexpr std::int16_t kMostId = std::numeric_limits<std::int16_t>::max();
 
@@ -30,6 +34,8 @@ void setText(MetaEdit& edit, const MetaStep& step)
     if (!index)
         return;
     MetaChunk* const chunk = edit.find(id, *index);
+    if (chunk == nullptr && count != 0 && id != kAnnotation && !edit.isLenient())
+        MetaEdit::refuse(step, "a file has one; --lenient adds another");
     if (chunk == nullptr)
         edit.add(id, asBytes(step.string()));
     else if (!step.isRemoval())
@@ -166,13 +172,41 @@ void setMarkerPosition(MetaEdit& edit, const MetaStep& step)
     });
 }
 
+/// Comments and the loops of "INST" that name a marker `from` name `to`; 0: none, and a loop is none then.
+void renameMarker(MetaEdit& edit, std::int16_t from, std::int16_t to)
+{
+    if (edit.find(kComments) != nullptr) {
+        CommentList list = commentsOf(edit);
+        for (std::size_t i = 0; i < list.comments.size(); ++i)
+            if (list.comments[i].marker == from && !edit.names(fmt::format("comt[{}].marker", i)))
+                list.comments[i].marker = to;
+        putList(edit, kComments, list, false);
+    }
+    MetaChunk* const chunk = edit.find(kInstrument);
+    auto instrument = chunk != nullptr ? AIFFInstrumentChunk::read(chunk->body) : std::nullopt;
+    if (!instrument)
+        return;
+    for (AIFFLoop* const loop : {&instrument->sustainLoop, &instrument->releaseLoop})
+        for (Packed<std::int16_t>* const marker : {&loop->beginMarker, &loop->endMarker})
+            if (loop->mode != AIFFLoop::kNone && *marker == from) {
+                *marker = to;
+                if (to == 0)
+                    loop->mode = AIFFLoop::kNone;
+            }
+    edit.replace(*chunk, instrument->write());
+}
+
 void setMarkerId(MetaEdit& edit, const MetaStep& step)
 {
+    const auto id = static_cast<std::int16_t>(step.number());
     changeMarker(edit, step, [&](MarkerList& list, AIFFMarker& marker) {
-        const auto id = static_cast<std::int16_t>(step.number());
-        const AIFFMarker* const other = list.find(id);
-        if (other != nullptr && other != &marker)
+        const std::int16_t before = marker.id;
+        if (id == before)
+            return;
+        if (list.find(id) != nullptr)
             MetaEdit::refuse(step, "another marker has this id");
+        if (list.find(before) == &marker)
+            renameMarker(edit, before, id);
         marker.id = id;
     });
 }
@@ -185,9 +219,22 @@ void removeMarker(MetaEdit& edit, const MetaStep& step)
         return;
     if (list.missingMarkers != 0)
         MetaEdit::refuseDamaged(kMarkers);
+    const AIFFMarker& marker = list.markers[*index];
+    if (list.find(marker.id) == &marker)
+        renameMarker(edit, marker.id, 0);
     list.markers.erase(list.markers.begin() + static_cast<std::ptrdiff_t>(*index));
     edit.itemRemoved(step, 0);
     putList(edit, kMarkers, list, list.markers.empty() && list.behind.empty());
+}
+
+void removeMarkers(MetaEdit& edit, const MetaStep&)
+{
+    const MetaChunk* const chunk = edit.find(kMarkers);
+    const auto list = chunk != nullptr ? MarkerList::read(chunk->body) : std::nullopt;
+    for (const AIFFMarker& marker : list ? list->markers : std::vector<AIFFMarker>())
+        renameMarker(edit, marker.id, 0);
+    if (MetaChunk* const left = edit.find(kMarkers))
+        edit.remove(*left);
 }
 
 using K = MetaKind;
@@ -204,11 +251,11 @@ constexpr MetaRule kRules[] = {
     {"comt[N]", K::none, {}, removeComment},
     {"comt", K::none, {}, removeChunk<kComments>},
 
-    {"mark[N].position", K::time, {}, setMarkerPosition},
+    {"mark[N].position", K::time, {}, setMarkerPosition, true},
     {"mark[N].name", K::text, {0, 255}, setMarkerName},
-    {"mark[N].id", K::integer, {1, 32767}, setMarkerId},
+    {"mark[N].id", K::integer, {1, 32767}, setMarkerId, true},
     {"mark[N]", K::none, {}, removeMarker},
-    {"mark", K::none, {}, removeChunk<kMarkers>},
+    {"mark", K::none, {}, removeMarkers},
 };
 
 } // namespace

@@ -245,7 +245,7 @@ constexpr MetaRule kRules[] = {
 
     {"strg[N].text", K::text, {0, kNoLimit}, setString},
 
-    {"mark[N].position", K::time, {}, setPosition},
+    {"mark[N].position", K::time, {}, setPosition, true},
     {"mark[N].name", K::text, {0, kNoLimit}, setMarkerName},
     {"mark[N].type", K::id, {}, setNumber<&CAFMarker::type>},
     {"mark[N].id", K::integer, {0, kMost32}, setNumber<&CAFMarker::id>},

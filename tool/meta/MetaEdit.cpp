@@ -41,17 +41,39 @@ RuleLists rulesOf(FourCC container)
     case kCaff:
         return {cafRules()};
     default:
-        return {waveRules(), listRules(), xmlRules()};
+        return {bextRules(), infoRules(), xmlRules(), cueRules(), waveRules()};
     }
+}
+
+/// Of these the brackets name an item, of others one of several chunks.
+bool isList(std::string_view group)
+{
+    constexpr std::array<std::string_view, 4> lists{"cue", "comt", "mark", "strg"};
+    return std::ranges::find(lists, group) != lists.end();
 }
 
 bool fits(const MetaRule& rule, const MetaName& name)
 {
     if (rule.pattern.ends_with('*'))
         return !name.rest.empty() && name.pattern(false).starts_with(rule.pattern.substr(0, rule.pattern.size() - 1));
-    // Of these the brackets name an item, of others one of several chunks.
-    constexpr std::array<std::string_view, 4> lists{"cue", "comt", "mark", "strg"};
-    return rule.pattern == name.pattern(std::ranges::find(lists, name.group()) != lists.end());
+    return rule.pattern == name.pattern(isList(name.group()));
+}
+
+/// Throws UsageError for what can stand in no brackets, whatever the file. Keys of CAF may have any.
+void requireIndices(const MetaName& name, bool isRemoval)
+{
+    constexpr std::array<std::string_view, 4> texts{"NAME", "AUTH", "(c)", "ANNO"}; // chunks, of which there are more
+    const std::string& group = name.group();
+    for (const MetaName::Part& part : name.parts) {
+        const bool isFirst = &part == &name.parts.front();
+        if (group == "info" || part.number() || (isFirst && group == "cue" && part.id()))
+            continue;
+        const bool takesNew =
+            !isRemoval && (!isFirst || isList(group) || std::ranges::find(texts, group) != texts.end());
+        if (!(part.isNew() && takesNew))
+            throw UsageError(fmt::format("{}: \"{}\" is no index here; [0] is the first{}", printable(name.text),
+                                         printable(part.index), takesNew ? ", [new] one behind the last" : ""));
+    }
 }
 
 constexpr std::array kContainers{fourCC("RIFF"), kFORM, kCaff};
@@ -66,10 +88,6 @@ std::vector<std::string_view> knownPatterns()
                     known.push_back(rule.pattern);
     return known;
 }
-
-} // namespace
-
-namespace {
 
 template <class T>
 T valueOr0(const MetaValue& value)
@@ -113,6 +131,9 @@ void MetaEdit::apply()
                                       held_.container == kFORM   ? "AIFF"
                                       : held_.container == kCaff ? "CAF"
                                                                  : "WAVE"));
+        if (step.isRemoval() && rule->isAlwaysThere)
+            refuse(step, fmt::format("it is always there; what goes is {}",
+                                     step.name.text.substr(0, step.name.text.rfind('.'))));
         try {
             if (step.text && !step.text->empty())
                 step.value = metaValueFromText(rule->kind, rule->range, *step.text, isLenient_);
@@ -180,8 +201,13 @@ MetaChunk* MetaEdit::chunkOf(const MetaStep& step, FourCC id, FourCC form)
     const MetaName::Part& group = step.name.parts.front();
     const auto index = group.number();
     MetaChunk* const chunk = index ? find(id, *index, form) : nullptr;
-    if (chunk == nullptr && !step.isRemoval() && index != 0U)
-        refuse(step, "there are not so many chunks");
+    if (chunk == nullptr && !step.isRemoval() && index != 0U) {
+        std::size_t count = 0;
+        while (find(id, count, form) != nullptr)
+            ++count;
+        refuse(step, count == 0 ? fmt::format("it has no {0}; {0} without an index makes one", group.name)
+                                : fmt::format("the last is {}[{}]", group.name, count - 1));
+    }
     return chunk;
 }
 
@@ -202,6 +228,8 @@ std::optional<std::size_t> MetaEdit::itemOf(const MetaStep& step, std::size_t pa
         return index;
     if (step.isRemoval())
         return std::nullopt;
+    if (!index)
+        refuse(step, fmt::format("\"{}\" is no index; [0] is the first, [new] one behind the last", item.index));
     refuse(step,
            count == 0 ? "there is none; [new] adds one" : fmt::format("the last is [{}]; [new] adds one", count - 1));
 }
@@ -259,6 +287,7 @@ MetaStep metaStep(const std::string& name, const std::optional<std::string>& tex
     const auto parsed = metaNameFromText(name);
     if (!parsed || !isEditedField(name))
         throw UsageError(fmt::format("there is no field \"{}\" to edit{}", printable(name), whyNotEdited(name)));
+    requireIndices(*parsed, !text || text->empty());
     MetaStep step{*parsed, text, {}};
     if (!text || text->empty())
         return step;

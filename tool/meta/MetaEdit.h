@@ -14,6 +14,8 @@ struct MetaStep {
     std::optional<std::string> text; // as typed; none: to be removed
     MetaValue value;                 // the same as its rule wants it
 
+    /// The name of another field of the same group: "bext[1].umid".
+    std::string sibling(std::string_view field) const { return name.upTo(0) + "." + std::string(field); }
     bool isRemoval() const { return std::holds_alternative<std::monostate>(value); }
     /// Empty, and 0, of a removal.
     std::string string() const;
@@ -99,12 +101,15 @@ struct MetaRule {
     MetaKind kind = MetaKind::none;
     MetaRange range;
     void (*apply)(MetaEdit& edit, const MetaStep& step) = nullptr;
+    bool isAlwaysThere = false; // goes only with the item that it is of
 };
 
 // By container, as readers are:
-std::span<const MetaRule> waveRules();
-std::span<const MetaRule> listRules(); // of WAVE too
-std::span<const MetaRule> xmlRules();  // of WAVE too
+std::span<const MetaRule> bextRules(); // of WAVE, as the next four
+std::span<const MetaRule> infoRules();
+std::span<const MetaRule> xmlRules();
+std::span<const MetaRule> cueRules();
+std::span<const MetaRule> waveRules(); // of its other chunks
 std::span<const MetaRule> aiffRules();
 std::span<const MetaRule> cafRules();
 

@@ -1,5 +1,7 @@
 #include "tool/meta/MetaFileEdit.h"
 
+#include "audiofile/ContainerChanges.h"
+#include "media/containers/ContainerHeaders.h"
 #include "media/userdata/AudioFileService.h"
 #include "platform/core/Status.h"
 #include "tool/shared/edits/EditProblems.h"
@@ -10,6 +12,7 @@
 #include <fmt/format.h>
 
 #include <algorithm>
+#include <array>
 #include <limits>
 #include <set>
 
@@ -24,6 +27,29 @@ std::vector<const MetaChunk*> chunksOf(const HeldMetadata& held, FourCC id)
         if (chunk.id == id)
             chunks.push_back(&chunk);
     return chunks;
+}
+
+/// Compressed files, and containers of chunks that nobody here writes.
+HeldMetadata holdEdited(const std::string& path)
+{
+    const auto isEdited = [](FourCC container) {
+        constexpr std::array edited{kRIFF, kRF64, kBW64, kFORM, kCaff};
+        return std::ranges::find(edited, container) != edited.end();
+    };
+    CAudioFileIO file;
+    const ContainerProblem problem = OpenContainer(file, referenceTo(path), 0);
+    if (problem.kind == ContainerProblem::Kind::noContainer)
+        requireKnown(path); // says best what is wrong with what is no audio
+    HeldMetadata held;
+    if (!problem)
+        held = holdMetadata(path);
+    else if (problem.kind != ContainerProblem::Kind::noContainer && problem.kind != ContainerProblem::Kind::onlyRead)
+        requireNone(problem);
+    if (!isEdited(held.container))
+        throw OtherKind("metadata of its kind of file is only read; that of WAVE, RF64, BW64, AIFF, AIFC and CAF files "
+                        "is edited",
+                        OtherKind::Kind::audio);
+    return held;
 }
 
 /// Chunks keep their offset in the plan, by which the same one is known before and after.
@@ -117,12 +143,8 @@ namespace {
 
 MetaPlan planInStages(const std::string& path, const MetaStages& stagesFor, bool isLenient, bool makesNext)
 {
-    {
-        CAudioFileIO file;
-        openContainer(file, path, 0); // says which containers are only read
-    }
     MetaPlan plan;
-    plan.before = holdMetadata(path);
+    plan.before = holdEdited(path);
     plan.after = plan.before;
     std::set<FourCC> touched;
     std::vector<std::string> removedItems;

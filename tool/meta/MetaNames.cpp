@@ -2,13 +2,32 @@
 
 #include <charconv>
 
-std::optional<std::size_t> MetaName::Part::number() const
+namespace {
+
+std::optional<std::size_t> numberFrom(std::string_view text)
 {
     std::size_t number = 0;
-    const auto [end, error] = std::from_chars(index.data(), index.data() + index.size(), number);
-    if (index.empty())
-        return 0;
-    return error == std::errc() && end == index.data() + index.size() ? std::optional(number) : std::nullopt;
+    const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), number);
+    return error == std::errc() && end == text.data() + text.size() ? std::optional(number) : std::nullopt;
+}
+
+} // namespace
+
+bool MetaName::Part::isNew() const
+{
+    constexpr std::string_view word = "new";
+    return index == word || (index.starts_with(word) && numberFrom(std::string_view(index).substr(word.size())));
+}
+
+std::optional<std::size_t> MetaName::Part::id() const
+{
+    constexpr std::string_view word = "id ";
+    return index.starts_with(word) ? numberFrom(std::string_view(index).substr(word.size())) : std::nullopt;
+}
+
+std::optional<std::size_t> MetaName::Part::number() const
+{
+    return index.empty() ? 0 : numberFrom(index);
 }
 
 std::string MetaName::pattern(bool keepsFirst) const

@@ -13,7 +13,10 @@ struct MetaName {
         std::string name;
         std::string index; // "0", "id 7", or a word that begins with "new"; empty: none
 
-        bool isNew() const { return index.starts_with("new"); }
+        /// "[new]", "[new2]" and so on.
+        bool isNew() const;
+        /// 7 of "[id 7]".
+        std::optional<std::size_t> id() const;
         /// 0 where there is none; none of what is no number.
         std::optional<std::size_t> number() const;
     };

@@ -6,6 +6,7 @@
 #include "audiofile/metadata/CueList.h"
 #include "audiofile/metadata/InfoList.h"
 #include "audiofile/metadata/InstrumentChunk.h"
+#include "audiofile/metadata/PlaylistChunk.h"
 #include "audiofile/metadata/SamplerChunk.h"
 #include "tool/meta/MetaReaders.h"
 
@@ -208,6 +209,23 @@ bool readCues(const MetaChunk& chunk, const MetaSource& source, MetaFields& fiel
     return true;
 }
 
+bool readPlaylist(const MetaChunk& chunk, const MetaSource& source, MetaFields& fields)
+{
+    const auto list = PlaylistChunk::read(chunk.body, source.order);
+    if (!list)
+        return false;
+    for (std::size_t i = 0; i < list->segments.size(); ++i) {
+        const PlaylistSegment& segment = list->segments[i];
+        const std::string item = itemName("segment", i);
+        fields.number(item + "cueId", std::uint32_t{segment.cueId});
+        fields.frames(item + "length", std::uint64_t{segment.length});
+        fields.number(item + "loops", std::uint32_t{segment.loops});
+    }
+    fields.missing(list->missingSegments);
+    fields.behind(list->behind);
+    return true;
+}
+
 void addInfo(const InfoList& list, MetaFields& fields)
 {
     for (const ListItem& item : list.items())
@@ -292,6 +310,7 @@ constexpr MetaReader kReaders[] = {
     {fourCC("iXML"), "ixml", readIXML},
     {fourCC("LIST"), "LIST", readList, fourCC("cue ")},
     {fourCC("cue "), "cue", readCues},
+    {fourCC("plst"), "plst", readPlaylist},
     {fourCC("smpl"), "smpl", readSampler},
     {fourCC("inst"), "inst", readInstrument},
     {fourCC("acid"), "acid", readAcid},

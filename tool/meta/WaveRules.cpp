@@ -1,10 +1,10 @@
-// How fields of "bext", "cart", "acid" and "smpl" are set.
+// How fields of "cart", "acid" and "smpl" are set.
 #include "audiofile/metadata/AcidChunk.h"
-#include "audiofile/metadata/BroadcastExtension.h"
 #include "audiofile/metadata/CartChunk.h"
 #include "audiofile/metadata/SamplerChunk.h"
+#include "tool/meta/ChunkFields.h"
+#include "tool/meta/CueReferences.h"
 #include "tool/meta/MetaEdit.h"
-#include "tool/shared/output/Failure.h"
 
 #include <fmt/format.h>
 
@@ -17,13 +17,6 @@ namespace {
 constexpr double kMost16 = 65535, kMost32 = 4294967295.0, kNoLimit = 1e9;
 
 // What a file gets that has no such chunk yet.
-
-BroadcastExtension freshOf(const MetaEdit&, const BroadcastExtension*)
-{
-    BroadcastExtension bext;
-    bext.version = 1;
-    return bext;
-}
 
 CartChunk freshOf(const MetaEdit&, const CartChunk*)
 {
@@ -52,8 +45,6 @@ SamplerChunk freshOf(const MetaEdit& edit, const SamplerChunk*)
 template <class Chunk>
 constexpr FourCC kIdOf = 0;
 template <>
-constexpr FourCC kIdOf<BroadcastExtension> = fourCC("bext");
-template <>
 constexpr FourCC kIdOf<CartChunk> = fourCC("cart");
 template <>
 constexpr FourCC kIdOf<AcidChunk> = fourCC("acid");
@@ -66,21 +57,6 @@ void changeChunk(MetaEdit& edit, const MetaStep& step, Change change)
     edit.change(step, kIdOf<Chunk>, freshOf(edit, static_cast<Chunk*>(nullptr)), change);
 }
 
-template <std::size_t size>
-void assign(FixedText<size>& field, const MetaStep& step)
-{
-    field.set(step.string()); // its rule knows the size
-}
-
-template <class T>
-void assign(Packed<T>& field, const MetaStep& step)
-{
-    if constexpr (std::is_floating_point_v<T>)
-        field = static_cast<T>(step.decimal());
-    else
-        field = static_cast<T>(step.number());
-}
-
 template <class Chunk, auto member>
 void set(MetaEdit& edit, const MetaStep& step)
 {
@@ -88,154 +64,11 @@ void set(MetaEdit& edit, const MetaStep& step)
 }
 
 template <auto member>
-constexpr auto setBext = set<BroadcastExtension, member>;
-template <auto member>
 constexpr auto setCart = set<CartChunk, member>;
 template <auto member>
 constexpr auto setAcid = set<AcidChunk, member>;
 template <auto member>
 constexpr auto setSampler = set<SamplerChunk, member>;
-
-// "bext":
-
-constexpr std::array kLoudness{&BroadcastExtension::loudnessValue, &BroadcastExtension::loudnessRange,
-                               &BroadcastExtension::maxTruePeakLevel, &BroadcastExtension::maxMomentaryLoudness,
-                               &BroadcastExtension::maxShortTermLoudness};
-constexpr std::array<std::string_view, kLoudness.size()> kLoudnessNames{
-    "loudnessValue", "loudnessRange", "maxTruePeakLevel", "maxMomentaryLoudness", "maxShortTermLoudness"};
-
-/// Where fields were reserved bytes, which are zero, they are told to be unknown.
-void raiseVersion(BroadcastExtension& bext, std::uint16_t version)
-{
-    const bool isNew =
-        !bext.hasLoudness() && std::ranges::all_of(kLoudness, [&](auto each) { return bext.*each == 0; });
-    if (version >= 2 && isNew)
-        for (const auto each : kLoudness)
-            bext.*each = BroadcastExtension::kNoLoudness;
-    bext.version = version;
-}
-
-std::string sibling(const MetaStep& step, std::string_view name)
-{
-    return step.name.upTo(0) + "." + std::string(name);
-}
-
-/// Raised for a field that it does not have, unless it is named.
-void requireVersion(const MetaEdit& edit, const MetaStep& step, BroadcastExtension& bext, std::uint16_t version)
-{
-    if (bext.version >= version)
-        return;
-    if (edit.names(sibling(step, "version")))
-        MetaEdit::refuse(step, fmt::format("version {} of bext has no such field; it is in version {}",
-                                           std::uint16_t{bext.version}, version));
-    raiseVersion(bext, version);
-}
-
-/// A lower version has reserved bytes where fields were: they must be empty, or be named as well.
-void setVersion(MetaEdit& edit, const MetaStep& step)
-{
-    changeChunk<BroadcastExtension>(edit, step, [&](BroadcastExtension& bext) {
-        const auto version = static_cast<std::uint16_t>(step.number());
-        if (version >= bext.version)
-            return raiseVersion(bext, version);
-        for (std::size_t i = 0; i < kLoudness.size() && bext.hasLoudness() && version < 2; ++i) {
-            const std::string name = sibling(step, kLoudnessNames[i]);
-            if (bext.*kLoudness[i] != BroadcastExtension::kNoLoudness && !edit.names(name))
-                MetaEdit::refuse(step, name + " is in version 2 only: remove it as well");
-            bext.*kLoudness[i] = std::int16_t{0};
-        }
-        if (version < 1 && bext.hasUMID() && !edit.names(sibling(step, "umid")))
-            MetaEdit::refuse(step, sibling(step, "umid") + " is in versions 1 and 2 only: remove it as well");
-        if (version < 1)
-            bext.umid = {};
-        bext.version = version;
-    });
-}
-
-template <std::size_t index>
-void setLoudness(MetaEdit& edit, const MetaStep& step)
-{
-    changeChunk<BroadcastExtension>(edit, step, [&](BroadcastExtension& bext) {
-        if (step.isRemoval() && !bext.hasLoudness())
-            return;
-        requireVersion(edit, step, bext, 2);
-        bext.*kLoudness[index] = step.isRemoval() ? std::int16_t{BroadcastExtension::kNoLoudness}
-                                                  : static_cast<std::int16_t>(std::lround(step.decimal() * 100));
-    });
-}
-
-void setUMID(MetaEdit& edit, const MetaStep& step)
-{
-    changeChunk<BroadcastExtension>(edit, step, [&](BroadcastExtension& bext) {
-        if (!step.isRemoval())
-            requireVersion(edit, step, bext, 1);
-        if (bext.version < 1)
-            return;
-        bext.umid = {};
-        if (const auto* const umid = std::get_if<Bytes>(&step.value))
-            std::ranges::copy(*umid, bext.umid.begin());
-    });
-}
-
-void setTimeReference(MetaEdit& edit, const MetaStep& step)
-{
-    changeChunk<BroadcastExtension>(edit, step, [&](BroadcastExtension& bext) {
-        bext.setTimeReference(edit.framesOf(step, std::numeric_limits<std::uint64_t>::max()));
-    });
-}
-
-constexpr std::string_view kLineEnd = "\r\n";
-
-/// Lines as the standard ends them.
-std::string withLineEnds(std::string_view text)
-{
-    std::string lines;
-    while (!text.empty()) {
-        const std::size_t end = std::min(text.find_first_of("\r\n"), text.size());
-        if (end != 0)
-            (lines += text.substr(0, end)) += kLineEnd;
-        text.remove_prefix(std::min(end + 1, text.size()));
-    }
-    return lines;
-}
-
-void setHistory(MetaEdit& edit, const MetaStep& step)
-{
-    changeChunk<BroadcastExtension>(
-        edit, step, [&](BroadcastExtension& bext) { replaceText(bext.codingHistory, withLineEnds(step.string())); });
-}
-
-/// One line, counted as they are shown: those that are not empty. The others keep their ends, whatever those are.
-void setHistoryLine(MetaEdit& edit, const MetaStep& step)
-{
-    changeChunk<BroadcastExtension>(edit, step, [&](BroadcastExtension& bext) {
-        std::string text(textOf(bext.codingHistory));
-        text.resize(std::min(text.find('\0'), text.size()));
-        std::vector<std::pair<std::size_t, std::size_t>> lines;
-        for (std::size_t begin = 0; begin < text.size();) {
-            const std::size_t end = std::min(text.find_first_of("\r\n", begin), text.size());
-            if (end != begin)
-                lines.emplace_back(begin, end - begin);
-            begin = end + 1;
-        }
-        const auto index = edit.itemOf(step, 1, lines.size());
-        if (!index)
-            return;
-        if (*index == lines.size()) {
-            if (!text.empty() && text.back() != '\n' && text.back() != '\r')
-                text += kLineEnd;
-            (text += step.string()) += kLineEnd;
-        } else if (step.isRemoval()) {
-            const auto [begin, size] = lines[*index];
-            const std::size_t next = *index + 1 < lines.size() ? lines[*index + 1].first : text.size();
-            text.erase(begin, next - begin);
-            edit.itemRemoved(step, 1);
-        } else {
-            text.replace(lines[*index].first, lines[*index].second, step.string());
-        }
-        replaceText(bext.codingHistory, text);
-    });
-}
 
 // "cart":
 
@@ -274,7 +107,7 @@ void setAcidRoot(MetaEdit& edit, const MetaStep& step)
 {
     changeChunk<AcidChunk>(edit, step, [&](AcidChunk& acid) {
         assign(acid.rootNote, step);
-        if (edit.names(sibling(step, "flags")))
+        if (edit.names(step.sibling("flags")))
             return;
         acid.flags = step.isRemoval() ? acid.flags & ~std::uint32_t{AcidChunk::kRootNoteSet}
                                       : acid.flags | AcidChunk::kRootNoteSet;
@@ -304,11 +137,10 @@ void setLoop(MetaEdit& edit, const MetaStep& step)
                 MetaEdit::refuse(step, "a new loop needs its start and its end");
             if (sampler.missingLoops != 0)
                 MetaEdit::refuseDamaged(fourCC("smpl"));
-            sampler.loops.emplace_back();
-            std::uint32_t id = 0;
+            std::uint32_t id = 0; // of a point that others may make for it, and of no other
             for (const SamplerLoop& each : sampler.loops)
                 id = std::max<std::uint32_t>(id, each.cueId + 1);
-            sampler.loops.back().cueId = sampler.loops.size() == 1 ? 0U : id;
+            sampler.loops.emplace_back().cueId = freeCueId(edit, id);
         }
         SamplerLoop& each = sampler.loops[*index];
         if (std::holds_alternative<MetaTime>(step.value))
@@ -334,23 +166,6 @@ void removeLoop(MetaEdit& edit, const MetaStep& step)
 using K = MetaKind;
 
 constexpr MetaRule kRules[] = {
-    {"bext.description", K::ascii, {0, 256}, setBext<&BroadcastExtension::description>},
-    {"bext.originator", K::line, {0, 32}, setBext<&BroadcastExtension::originator>},
-    {"bext.originatorReference", K::line, {0, 32}, setBext<&BroadcastExtension::originatorReference>},
-    {"bext.originationDate", K::date, {}, setBext<&BroadcastExtension::originationDate>},
-    {"bext.originationTime", K::clock, {}, setBext<&BroadcastExtension::originationTime>},
-    {"bext.timeReference", K::time, {}, setTimeReference},
-    {"bext.version", K::integer, {0, 2}, setVersion},
-    {"bext.umid", K::umid, {}, setUMID},
-    {"bext.loudnessValue", K::decimal, {-99.99, 99.99}, setLoudness<0>},
-    {"bext.loudnessRange", K::decimal, {0, 99.99}, setLoudness<1>},
-    {"bext.maxTruePeakLevel", K::decimal, {-99.99, 99.99}, setLoudness<2>},
-    {"bext.maxMomentaryLoudness", K::decimal, {-99.99, 99.99}, setLoudness<3>},
-    {"bext.maxShortTermLoudness", K::decimal, {-99.99, 99.99}, setLoudness<4>},
-    {"bext.codingHistory", K::ascii, {0, kNoLimit}, setHistory},
-    {"bext.codingHistory[N]", K::line, {0, kNoLimit}, setHistoryLine},
-    {"bext", K::none, {}, removeChunk<fourCC("bext")>},
-
     {"cart.version", K::line, {0, 4}, setCart<&CartChunk::version>},
     {"cart.title", K::line, {0, 64}, setCart<&CartChunk::title>},
     {"cart.artist", K::line, {0, 64}, setCart<&CartChunk::artist>},
@@ -391,8 +206,8 @@ constexpr MetaRule kRules[] = {
     {"smpl.smpteOffset", K::smpteOffset, {}, setSampler<&SamplerChunk::smpteOffset>},
     {"smpl.loop[N].cueId", K::integer, {0, kMost32}, setLoop<&SamplerLoop::cueId>},
     {"smpl.loop[N].type", K::loopType, {}, setLoop<&SamplerLoop::type>},
-    {"smpl.loop[N].start", K::time, {}, setLoop<&SamplerLoop::start>},
-    {"smpl.loop[N].end", K::time, {}, setLoop<&SamplerLoop::end>},
+    {"smpl.loop[N].start", K::time, {}, setLoop<&SamplerLoop::start>, true},
+    {"smpl.loop[N].end", K::time, {}, setLoop<&SamplerLoop::end>, true},
     {"smpl.loop[N].fraction", K::integer, {0, kMost32}, setLoop<&SamplerLoop::fraction>},
     {"smpl.loop[N].playCount", K::integer, {0, kMost32}, setLoop<&SamplerLoop::playCount>},
     {"smpl.loop[N]", K::none, {}, removeLoop},

@@ -2,7 +2,16 @@
 
 namespace {
 
-constexpr FourCC kRange = fourCC("ltxt");
+constexpr FourCC kRange = fourCC("ltxt"), kFile = fourCC("file");
+
+/// The point that an item speaks of; none of items of other kinds, and of one that ends ahead of it.
+std::optional<std::uint32_t> cueIdOf(const ListItem& item, std::endian order)
+{
+    const bool speaks = item.id == fourCC("labl") || item.id == fourCC("note") || item.id == kRange || item.id == kFile;
+    return speaks && item.body.size() >= sizeof(std::uint32_t)
+               ? std::optional(load<std::uint32_t>(item.body.data(), order))
+               : std::nullopt;
+}
 
 /// Whether the item is of the kind and speaks of the point.
 auto speaksOf(FourCC id, std::uint32_t cueId, std::endian order)
@@ -92,12 +101,30 @@ void AssociatedDataList::changeRanges(const std::function<void(CueRangeFields& f
     }
 }
 
+void AssociatedDataList::renameCue(std::uint32_t from, std::uint32_t to)
+{
+    for (std::size_t index = 0; index < items().size(); ++index)
+        if (cueIdOf(items()[index], order()) == from) {
+            Bytes body = items()[index].body;
+            store(body.data(), to, order());
+            replaceBody(index, std::move(body));
+        }
+}
+
+std::set<std::uint32_t> AssociatedDataList::cueIds() const
+{
+    std::set<std::uint32_t> ids;
+    for (const ListItem& item : items())
+        if (const auto cueId = cueIdOf(item, order()))
+            ids.insert(*cueId);
+    return ids;
+}
+
 void AssociatedDataList::eraseCues(const std::function<bool(std::uint32_t cueId)>& isGone)
 {
     eraseIf([&](const ListItem& item) {
-        const bool speaks = item.id == fourCC("labl") || item.id == fourCC("note") || item.id == kRange;
-        return speaks && item.body.size() >= sizeof(std::uint32_t) &&
-               isGone(load<std::uint32_t>(item.body.data(), order()));
+        const auto cueId = cueIdOf(item, order());
+        return cueId && item.id != kFile && isGone(*cueId);
     });
 }
 

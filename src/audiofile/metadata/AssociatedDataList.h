@@ -5,6 +5,7 @@
 #include "audiofile/metadata/Records.h"
 
 #include <functional>
+#include <set>
 
 /// "labl", the name of a point, or "note", a remark on it. Texts are bytes up to a NUL, in the encoding of the writer.
 struct CueText {
@@ -73,6 +74,10 @@ public:
     void addNote(std::uint32_t cueId, std::string_view text) { addText(fourCC("note"), cueId, text); }
     /// Of every range, whose text stays to the byte.
     void changeRanges(const std::function<void(CueRangeFields& fields)>& change);
+    /// What is said of `from`, a file in the list ("file") too, is said of `to`.
+    void renameCue(std::uint32_t from, std::uint32_t to);
+    /// Of which points anything is said.
+    std::set<std::uint32_t> cueIds() const;
     /// As eraseCue, of all points that `isGone` says yes to.
     void eraseCues(const std::function<bool(std::uint32_t cueId)>& isGone);
 

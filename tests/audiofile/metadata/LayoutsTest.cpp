@@ -13,6 +13,7 @@
 #include "audiofile/metadata/InfoList.h"
 #include "audiofile/metadata/InstrumentChunk.h"
 #include "audiofile/metadata/MarkerList.h"
+#include "audiofile/metadata/PlaylistChunk.h"
 #include "audiofile/metadata/SamplerChunk.h"
 #include "support/Hex.h"
 
@@ -56,6 +57,8 @@ constexpr Kind kKinds[] = {
     {"INST", rewritten<AIFFInstrumentChunk>, 20},
     {"cue ", rewritten<CueList, little>, 4},
     {"cue  of RIFX", rewritten<CueList, big>, 4},
+    {"plst", rewritten<PlaylistChunk, little>, 4},
+    {"plst of RIFX", rewritten<PlaylistChunk, big>, 4},
     {"INFO", rewritten<InfoList, little>, 4},
     {"INFO of RIFX", rewritten<InfoList, big>, 4},
     {"adtl", rewritten<AssociatedDataList, little>, 4},

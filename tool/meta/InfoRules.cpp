@@ -1,0 +1,70 @@
+// How fields of LIST "INFO" are set.
+#include "audiofile/metadata/InfoList.h"
+#include "tool/meta/ChunkFields.h"
+#include "tool/meta/MetaEdit.h"
+#include "tool/shared/arguments/Nearest.h"
+
+#include <fmt/format.h>
+
+#include <algorithm>
+
+namespace {
+
+constexpr double kNoLimit = 1e9;
+
+/// Ids that are in no list of them are taken where they stand already, so that none comes of a slip.
+void requireKnown(const MetaEdit& edit, const MetaStep& step, const std::string& id, bool stands)
+{
+    std::vector<std::string> names;
+    for (const FourCC known : InfoList::knownIds())
+        names.push_back(fourCCText(known));
+    if (stands || edit.isLenient() || std::ranges::find(names, id) != names.end())
+        return;
+    const std::vector<std::string_view> known(names.begin(), names.end());
+    MetaEdit::refuse(step, fmt::format("\"{}\" is no registered id{}{}", id, didYouMean(id, known),
+                                       id.size() == 4 ? "; --lenient writes it" : ""));
+}
+
+void setInfo(MetaEdit& edit, const MetaStep& step)
+{
+    const MetaName::Part& part = step.name.parts[1];
+    const std::string& text = part.name;
+    if (step.name.parts.size() != 2 || text.size() != sizeof(FourCC)) {
+        requireKnown(edit, step, step.name.rest, false);
+        MetaEdit::refuse(step, "an id has four characters");
+    }
+    const FourCC id = fourCC(text[0], text[1], text[2], text[3]);
+    MetaChunk* const chunk = edit.chunkOf(step, kListId, InfoList::kForm);
+    auto list = listIn<InfoList>(chunk);
+    const auto count = static_cast<std::size_t>(std::ranges::count(list.items(), id, &ListItem::id));
+    if (step.isRemoval()) {
+        if (const auto index = part.number(); index && list.eraseAt(id, *index)) {
+            if (count > 1)
+                edit.itemRemoved(step, 1);
+            putList(edit, chunk, list);
+        }
+        return;
+    }
+    requireKnown(edit, step, text, count != 0);
+    const bool isFirst = part.index.empty() && count == 0;
+    list.setAt(id, isFirst ? 0 : *edit.itemOf(step, 1, count), step.string());
+    putList(edit, chunk, list);
+}
+
+void removeInfo(MetaEdit& edit, const MetaStep& step)
+{
+    if (MetaChunk* const chunk = edit.chunkOf(step, kListId, InfoList::kForm))
+        edit.remove(*chunk);
+}
+
+constexpr MetaRule kRules[] = {
+    {"info", MetaKind::none, {}, removeInfo},
+    {"info.*", MetaKind::text, {0, kNoLimit}, setInfo},
+};
+
+} // namespace
+
+std::span<const MetaRule> infoRules()
+{
+    return kRules;
+}

@@ -14,3 +14,7 @@ option(KTFILES_WITH_FFMPEG "Build the decoder module" ${decoding_FOUND})
 # Tags of formats that the library does not annotate, in another module; without TagLib the library has none.
 pkg_check_modules(taglib IMPORTED_TARGET taglib)
 option(KTFILES_WITH_TAGLIB "Build the module of tags" ${taglib_FOUND})
+
+# Loudness by EBU R 128, in another module; without libebur128 none is measured.
+pkg_check_modules(ebur128 IMPORTED_TARGET libebur128)
+option(KTFILES_WITH_EBUR128 "Build the module that measures loudness" ${ebur128_FOUND})

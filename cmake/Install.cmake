@@ -1,5 +1,5 @@
 # What `make install` puts where: the library, its headers by room, the CMake package, the pkg-config file, the command.
-# Components, which are also the packages: runtime, development, command, decoders and tags where the modules are built.
+# Components, which are also the packages: runtime, development, command; decoders, tags and loudness where the modules are built.
 
 include(CMakePackageConfigHelpers)
 
@@ -13,6 +13,10 @@ endif()
 
 if(TARGET ktfiles_tags)
     install(TARGETS ktfiles_tags LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR}/ktfiles COMPONENT tags)
+endif()
+
+if(TARGET ktfiles_loudness)
+    install(TARGETS ktfiles_loudness LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR}/ktfiles COMPONENT loudness)
 endif()
 
 # The headers of implementations (platform/posix/ and the like) are nobody's business.
@@ -30,6 +34,7 @@ set(media_headers
     media/containers/StoredFormat.h
     media/packets/FileEnds.h media/packets/PacketTable.h
     media/decoding/CompressedAudio.h media/decoding/ConvertingReader.h
+    media/loudness/LoudnessMeter.h
     media/tags/EmbeddedTags.h
     media/userdata/AudioFileService.h)
 foreach(header IN LISTS media_headers)

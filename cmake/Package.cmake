@@ -1,4 +1,5 @@
-# `cpack -G DEB`: libktfiles0, libktfiles-dev, ktfiles, libktfiles-ffmpeg and libktfiles-taglib where their modules are built.
+# `cpack -G DEB`: libktfiles0, libktfiles-dev, ktfiles, libktfiles-ffmpeg, libktfiles-taglib and libktfiles-ebur128 where
+# their modules are built.
 
 set(CPACK_PACKAGE_NAME ktfiles)
 set(CPACK_PACKAGE_VENDOR "KTFiles")
@@ -35,6 +36,15 @@ if(TARGET ktfiles_tags)
     set(CPACK_DEBIAN_TAGS_PACKAGE_SECTION libs)
     set(CPACK_DEBIAN_TAGS_PACKAGE_DEPENDS "libktfiles${PROJECT_VERSION_MAJOR} (= ${PROJECT_VERSION})")
     set(CPACK_COMPONENT_TAGS_DESCRIPTION "Tags of compressed audio for the shared library")
+endif()
+
+if(TARGET ktfiles_loudness)
+    list(APPEND CPACK_COMPONENTS_ALL loudness)
+    list(APPEND recommended libktfiles-ebur128)
+    set(CPACK_DEBIAN_LOUDNESS_PACKAGE_NAME libktfiles-ebur128)
+    set(CPACK_DEBIAN_LOUDNESS_PACKAGE_SECTION libs)
+    set(CPACK_DEBIAN_LOUDNESS_PACKAGE_DEPENDS "libktfiles${PROJECT_VERSION_MAJOR} (= ${PROJECT_VERSION})")
+    set(CPACK_COMPONENT_LOUDNESS_DESCRIPTION "Measuring loudness by EBU R 128 for the shared library")
 endif()
 list(JOIN recommended ", " CPACK_DEBIAN_RUNTIME_PACKAGE_RECOMMENDS)
 

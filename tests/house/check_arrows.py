@@ -20,6 +20,8 @@ ARROWS = {
     "media/ffmpeg": {"media/decoding"},
     "media/tags": {"media/containers", "platform"},
     "media/taglib": {"media/tags"},
+    "media/loudness": {"media/containers", "platform"},
+    "media/ebur128": {"media/loudness"},
     "files": {"platform"},
     "loops/tagging": {"platform/core"},
     "audiofile/metadata": {"loops/tagging", "platform/core"},

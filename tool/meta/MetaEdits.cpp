@@ -25,6 +25,18 @@ std::string inWords(const std::vector<MetaChange>& changes)
     return text;
 }
 
+/// Why first, with the fields of which that is so.
+std::string inWords(const std::vector<UnmeasuredField>& unmeasured)
+{
+    std::map<std::string, std::string> fields;
+    for (const UnmeasuredField& each : unmeasured)
+        fields[each.why] += (fields[each.why].empty() ? "" : ", ") + each.field;
+    std::string text;
+    for (const auto& [why, names] : fields)
+        text += "; " + why + ", no " + names;
+    return text;
+}
+
 } // namespace
 
 MetaEdits::MetaEdits(const MetaEditWords& words, EditOptions options, const OutputOptions& output)
@@ -79,14 +91,21 @@ void MetaEdits::tell(const std::string& path, const MetaPlan& plan, const std::s
                     std::visit([&, name = key](const auto& each) { json.member(name, each); }, **value);
             json.endObject();
         }
-        json.endArray().member("dryRun", options_.dryRun).knownMember("backup", backup).endObject();
+        json.endArray();
+        if (!plan.unmeasured.empty()) {
+            json.key("notMeasured").beginArray();
+            for (const UnmeasuredField& each : plan.unmeasured)
+                json.beginObject().member("field", each.field).member("why", each.why).endObject();
+            json.endArray();
+        }
+        json.member("dryRun", options_.dryRun).knownMember("backup", backup).endObject();
         json_.end();
     } else if (!output_.quiet) {
         const std::string what =
             plan.items.empty()
                 ? "unchanged"
                 : fmt::format("{} {}", options_.dryRun ? words_.dryRun : words_.done, inWords(plan.changes));
-        Output::standard().print(
-            "{}\n", printable(fmt::format("{}: {}{}{}", path, what, backup.empty() ? "" : "; backup ", backup)));
+        Output::standard().print("{}\n", printable(fmt::format("{}: {}{}{}{}", path, what, inWords(plan.unmeasured),
+                                                               backup.empty() ? "" : "; backup ", backup)));
     }
 }

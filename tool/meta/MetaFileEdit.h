@@ -16,10 +16,16 @@ struct MetaItemEdit {
     std::optional<Bytes> body; // none: it goes
 };
 
+/// One that was measured and has no number, and why.
+struct UnmeasuredField {
+    std::string field, why;
+};
+
 struct MetaPlan {
     std::vector<MetaChange> changes;
     std::vector<MetaItemEdit> items; // those that are written in order of index, removals last
     std::vector<FourCC> ids;         // of the chunks that change
+    std::vector<UnmeasuredField> unmeasured;
     HeldMetadata before, after;
 };
 

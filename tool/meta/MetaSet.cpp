@@ -1,4 +1,5 @@
 // ktfiles meta set, and remove.
+#include "tool/meta/MeasuredFields.h"
 #include "tool/meta/MetaCommand.h"
 #include "tool/meta/MetaEdits.h"
 #include "tool/shared/arguments/CommandLine.h"
@@ -16,6 +17,7 @@ struct EditArguments {
     std::vector<std::string> words;
     FileArguments files; // those of the list; the others are among the words
     bool isLenient = false;
+    MeasuredFields measured;
     EditOptions options;
 };
 
@@ -50,7 +52,7 @@ std::vector<MetaStep> takeAssignments(EditArguments& arguments)
             addStep(steps, metaStep(word.substr(0, equals), meantText(std::string_view(word).substr(equals + 1)),
                                     arguments.isLenient));
     }
-    if (steps.empty())
+    if (steps.empty() && !arguments.measured.any())
         throw UsageError("FIELD=VALUE is missing; fields are those that ktfiles meta prints");
     return steps;
 }
@@ -88,13 +90,16 @@ bool editFiles(EditArguments& arguments, const std::vector<MetaStep>& steps, con
         return false;
     MetaEdits edits(words, arguments.options, output);
     for (const std::string& path : files)
-        edits.edit(path, [&](const std::string& target) { return planMetadata(target, steps, arguments.isLenient); });
+        edits.edit(path, [&](const std::string& target) {
+            return planMeasured(target, steps, arguments.measured, arguments.isLenient, output.quiet);
+        });
     return edits.finish();
 }
 
 bool runSet(EditArguments& arguments, const OutputOptions& output)
 {
     const std::vector<MetaStep> steps = takeAssignments(arguments);
+    requireNotTyped(arguments.measured, steps);
     return editFiles(arguments, steps, {"set", "set", "would set"}, output);
 }
 
@@ -126,6 +131,8 @@ void declareMetaEdits(CommandLine& commandLine, Verb& meta)
                             toSet, runSet);
     set.addFlag("--lenient", toSet.isLenient,
                 "Take what the standards do not: texts that are not ASCII, other dates, unknown ids");
+    set.addFlag("--loudness", toSet.measured.loudness,
+                "Measure the loudness of WAVE files by EBU R 128, and set the five fields of bext that tell of it");
     declareEdit(commandLine, meta, "remove", "Remove fields, items of lists, or whole chunks by their group",
                 "The audio files, and the FIELDs to remove, as in info.ISFT, cue[2], bext", toRemove, runRemove);
 }

@@ -3,8 +3,8 @@
 #pragma once
 
 #include "tool/overview/SoundLanes.h"
-#include "tool/overview/SoundReader.h"
 #include "tool/shared/edits/OutputFile.h"
+#include "tool/shared/input/SoundReader.h"
 
 #include <cstdint>
 #include <functional>

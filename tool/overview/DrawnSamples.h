@@ -2,8 +2,8 @@
 #pragma once
 
 #include "tool/overview/FileOverview.h"
-#include "tool/overview/SoundReader.h"
 #include "tool/overview/WaveformPicture.h"
+#include "tool/shared/input/SoundReader.h"
 
 #include <cstdint>
 #include <functional>

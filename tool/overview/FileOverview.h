@@ -2,8 +2,8 @@
 #pragma once
 
 #include "platform/core/KTMem.h"
-#include "tool/overview/SoundReader.h"
 #include "tool/overview/WaveformOutline.h"
+#include "tool/shared/input/SoundReader.h"
 
 #include <memory>
 #include <string>

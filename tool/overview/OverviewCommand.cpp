@@ -1,4 +1,5 @@
 // ktfiles overview: waveforms as sparklines, numbers and pictures, and stored in the files.
+#include "loops/overview/MDOverview.h"
 #include "tool/overview/ContactSheet.h"
 #include "tool/overview/DrawnSamples.h"
 #include "tool/overview/OverviewArguments.h"
@@ -73,6 +74,13 @@ void writePictures(const std::string& path, const WaveformPicture& picture, cons
         });
 }
 
+void requireFewChannels(const SoundReader& sound)
+{
+    if (sound.info().channels > MDOverview::kMostChannels)
+        throw Failure(fmt::format("has {} channels; an overview folds {} at most", sound.info().channels,
+                                  MDOverview::kMostChannels));
+}
+
 // From the overview that is stored where it is asked for and fine enough, else from the samples.
 WaveformPicture pictureOfFile(const std::string& path, SoundReader* sound, const FileOverview* stored,
                               const OverviewArguments& arguments, bool showsProgress)
@@ -89,7 +97,7 @@ WaveformPicture pictureOfFile(const std::string& path, SoundReader* sound, const
     }
     std::optional<SoundReader> own;
     if (sound == nullptr)
-        sound = &own.emplace(path);
+        requireFewChannels(*(sound = &own.emplace(path)));
     Progress progress("reading", range.to - range.from, !showsProgress);
     const auto advance = [&progress](std::int64_t done) { progress.advance(done); };
     return pictureOf(frame, drawnSamples(*sound, range, lanes, frame, advance), settings);
@@ -155,6 +163,7 @@ Reading readFile(const std::string& path, const Task& task)
         return reading;
     }
     SoundReader sound(path);
+    requireFewChannels(sound);
     if (!arguments.data.empty())
         writeData(path, sound, arguments);
     Reading reading{task.needsPoints ? FileOverview::computed(sound, showsProgress) : FileOverview::described(sound),
@@ -170,6 +179,7 @@ StoreResult store(const std::string& path, Reading& reading, const OverviewArgum
     SafeEdit edit(path, arguments.edit);
     if (versionOf(path) != reading.version) {
         SoundReader sound(edit.target());
+        requireFewChannels(sound);
         reading.overview = FileOverview::computed(sound, false);
     }
     return storeOverview(edit, reading.overview, arguments.edit);

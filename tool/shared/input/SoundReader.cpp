@@ -1,6 +1,5 @@
-#include "tool/overview/SoundReader.h"
+#include "tool/shared/input/SoundReader.h"
 
-#include "loops/overview/MDOverview.h"
 #include "tool/shared/input/InputFile.h"
 #include "tool/shared/output/Failure.h"
 
@@ -17,9 +16,6 @@ void requireSound(const AudioFileInfo& info)
 {
     if (!info.compressed && !info.IsLinearPCM())
         throw Failure("holds samples of a kind that is not read");
-    if (info.channels > MDOverview::kMostChannels)
-        throw Failure(
-            fmt::format("has {} channels; an overview folds {} at most", info.channels, MDOverview::kMostChannels));
     if (info.frames == 0)
         throw Failure("holds no sound");
 }

@@ -73,7 +73,7 @@ _ktfiles()
                 --force --threads $files $common" -- "$cur")) ;;
             lock/*) COMPREPLY=($(compgen -W "--read --write --presenter --timeout -- $common" -- "$cur")) ;;
             scan/*) COMPREPLY=($(compgen -W "--csv --threads $files $common" -- "$cur")) ;;
-            meta/set) COMPREPLY=($(compgen -W "--lenient --loudness $files $edit $common" -- "$cur")) ;;
+            meta/set) COMPREPLY=($(compgen -W "--lenient --loudness --md5 $files $edit $common" -- "$cur")) ;;
             meta/remove) COMPREPLY=($(compgen -W "$files $edit $common" -- "$cur")) ;;
             meta/*) COMPREPLY=($(compgen -W "--only --csv --threads $files $common" -- "$cur")) ;;
             tags/*) COMPREPLY=($(compgen -W "--csv --threads $files $common" -- "$cur")) ;;

@@ -65,7 +65,7 @@ FIELDS = {
     "cart.timer[0].usage": "SEG1", "cart.timer[0].position": 4800, "cart.url": "http://x/", "cart.tagText": "text\r\n", "chna.tracks": 1,
     "chna.uids": 1, "chna.uid[0].track": 1, "chna.uid[0].uid": "ATU_00000001", "chna.uid[0].trackFormat": "AT_00010001_01",
     "chna.uid[0].packFormat": "AP_00010001", "axml": "1 audioProgramme, 2 audioObject", "fact.frames": 100, "peak.version": 1,
-    "peak.timeStamp": 0, "peak.channel[0].value": 0.5, "peak.channel[0].position": 24, "md5": bytes(range(16)).hex(), "xmp": "<x/>",
+    "peak.timeStamp": 0, "peak.channel[0].value": 0.5, "peak.channel[0].position": 24, "md5": bytes(range(16))[::-1].hex(), "xmp": "<x/>",
     "strc": "00" * 32, "AbCd": b"to\1you".hex(), "bext[1].description": "again", "bext[1].originator": "somebody",
     "bext[1].originatorReference": "REF-1", "bext[1].originationDate": "2026-11-22", "bext[1].originationTime": "10:44:00",
     "bext[1].timeReference": 0, "bext[1].version": 0,

@@ -1,4 +1,5 @@
-"""ktfiles meta set --loudness: the published cases of EBU Tech 3341 and 3342, and ffmpeg on other sound."""
+"""ktfiles meta set --md5: digests as others reckon them; --loudness: the published cases of EBU Tech 3341 and 3342, and ffmpeg on other sound."""
+import hashlib
 import math
 import os
 import re
@@ -166,6 +167,47 @@ class Loudness(CommandTest):
             self.assertEqual(process.wait(), -signal.SIGINT)
             self.assert_no_litter("a.wav")
         self.assertNotIn(b"bext", path.read_bytes()[-4096:])
+
+
+class Digest(CommandTest):
+    def test_it_is_that_of_the_sound_and_is_checked(self):
+        def body(name):
+            content = (self.folder / name).read_bytes()
+            at = content.rindex(b"MD5 ")
+            self.assertEqual(struct.unpack_from("<I", content, at + 4), (16,))
+            return content[at + 8:at + 24]
+        odd = wave()[:28] + struct.pack("<IHH", 48000, 1, 8) + b"data" + struct.pack("<I", 201) + wave()[44:] + b"\7\0"  # a pad byte, which is none of the sound
+        odd = odd[:4] + struct.pack("<I", len(odd) - 8) + odd[8:]
+        rf64 = b"RF64\xff\xff\xff\xffWAVE" + chunk(b"ds64", struct.pack("<QQQI", 272 - 8, 200, 100, 0)) + wave()[12:40] + b"\xff" * 4 + wave()[44:]
+        cases = [("a.wav", wave(chunk(b"note", b"odd"), frames=1000), 44, 2000), ("odd.wav", odd, 44, 201), ("big.wav", rf64, 80, 200),
+                 ("none.wav", wave(frames=0), 44, 0), ("old.wav", wave(chunk(b"MD5 ", bytes(16))), 44, 200)]
+        for name, content, start, size in cases:
+            with self.subTest(name):
+                path = self.write(name, content)
+                digest = hashlib.md5(content[start:start + size])
+                self.run_command("meta", "set", "--md5", "--in-place", name)
+                self.assertEqual(body(name), digest.digest()[::-1])
+                self.assertEqual(self.lines("meta", "--only", "md5", name), ["md5\t" + digest.hexdigest()])
+                told = subprocess.run(["mediainfo", "--Full", path], capture_output=True, text=True).stdout
+                self.assertIn(digest.hexdigest().upper(), told) if size else None
+                self.assertEqual(path.read_bytes()[start:start + size], content[start:start + size])
+                self.assertTrue(self.lines("meta", "set", "--md5", name)[0].endswith(": unchanged"))
+                self.run_command("meta", "set", name, "info.INAM=title", "bext.description=later")  # which leaves it true
+                self.assertEqual(self.lines("info", "--check", name), [])
+                if size:
+                    changed = bytearray(path.read_bytes())
+                    changed[start + size // 2] ^= 1
+                    path.write_bytes(changed)
+                    self.assertIn("states another MD5", self.lines("info", "--check", name, status=1)[0])
+                self.run_command("meta", "remove", name, "md5")
+                self.assertNotIn(b"MD5 ", path.read_bytes())
+        for name, content, text in (("a.caf", caf(), "md5 is no field of CAF files"), ("cut.wav", wave()[:-50], "ends ahead of its sound")):
+            self.write(name, content)
+            self.assertIn(text, self.failure("meta", "set", "--md5", name))
+        for words in (["--md5", "a.wav", "md5=" + "0" * 32], ["a.wav", "md5=00"], ["a.wav", "md5=" + "0" * 31], ["a.wav", "md5=" + "0g" * 16]):
+            self.failure("meta", "set", *words, status=2)
+        self.run_command("meta", "set", "a.wav", "md5=00112233445566778899aabbccddeeff")  # as a list of an archive has it
+        self.assertEqual(body("a.wav").hex(), "ffeeddccbbaa99887766554433221100")
 
 
 if __name__ == "__main__":

@@ -12,6 +12,7 @@
 #include "tool/shared/output/ClockTime.h"
 #include "tool/shared/output/DataRecords.h"
 #include "tool/shared/output/Failure.h"
+#include "tool/shared/output/HexText.h"
 #include "tool/shared/output/Progress.h"
 #include "tool/shared/output/Table.h"
 
@@ -85,14 +86,6 @@ struct Description {
     FileFacts facts;
     std::string md5, sha256; // of the sound, in hexadecimal; empty where there is none
 };
-
-std::string hexText(const Bytes& digest)
-{
-    std::string text;
-    for (const std::byte byte : digest)
-        fmt::format_to(std::back_inserter(text), "{:02x}", std::to_integer<unsigned>(byte));
-    return text;
-}
 
 /// Of what is compressed throughout nobody keeps one but FLAC, which states its own.
 void addDigests(Description& description, const std::string& path, const InfoOptions& wanted, bool quiet)

@@ -1,10 +1,13 @@
 #include "tool/meta/MeasuredFields.h"
 
+#include "audiofile/AudioDigest.h"
 #include "media/loudness/LoudnessMeter.h"
 #include "platform/core/Status.h"
 #include "tool/shared/arguments/UsageError.h"
+#include "tool/shared/input/InputFile.h"
 #include "tool/shared/input/SoundReader.h"
 #include "tool/shared/output/Failure.h"
+#include "tool/shared/output/HexText.h"
 #include "tool/shared/output/Progress.h"
 
 #include <fmt/format.h>
@@ -29,9 +32,14 @@ constexpr std::array kLoudness{LoudnessField{"bext.loudnessValue", &Loudness::in
                                LoudnessField{"bext.maxShortTermLoudness", &Loudness::maxShortTerm, 3, "LUFS"}};
 constexpr double kMostStored = 99.99; // of either sign
 
-MetaStep versionStep()
+/// Of a file that was cut the rest may still be had.
+void requireWhole(const std::string& path)
 {
-    return metaStep("bext.version", "2", false);
+    CAudioFileIO file;
+    openContainer(file, path, 0);
+    if (file.Info().missingDataSize > 0)
+        throw Failure(fmt::format("ends ahead of its sound, {} bytes of which are missing: nothing is measured",
+                                  file.Info().missingDataSize));
 }
 
 Loudness measure(SoundReader& sound, const std::string& path, bool quiet)
@@ -69,9 +77,6 @@ void addLoudness(const std::string& path, bool quiet, std::vector<MetaStep>& ste
                  std::vector<UnmeasuredField>& unmeasured)
 {
     SoundReader sound(path);
-    if (sound.info().missingDataSize > 0)
-        throw Failure(fmt::format("ends ahead of its sound, {} bytes of which are missing: nothing is measured",
-                                  sound.info().missingDataSize));
     const Loudness loudness = measure(sound, path, quiet);
     const double seconds = static_cast<double>(sound.info().frames) / sampleRateOf(sound.info());
     for (const LoudnessField& field : kLoudness) {
@@ -81,6 +86,28 @@ void addLoudness(const std::string& path, bool quiet, std::vector<MetaStep>& ste
             unmeasured.push_back({field.name, whyNone(field, loudness, seconds)});
         steps.push_back(metaStep(field.name, isStored ? fmt::format("{:.2f}", *value) : "", false));
     }
+}
+
+MetaStep digestStep(const Bytes& digest)
+{
+    return metaStep("md5", hexText(digest), false);
+}
+
+/// Of the bytes of the samples, which may be none.
+Bytes digestOf(const std::string& path, bool quiet)
+{
+    CAudioFileIO file;
+    openContainer(file, path, 0);
+    const AudioFileInfo& info = file.Info();
+    platform::Digest digest(platform::Digest::Kind::md5);
+    platform::Digest* const digests[] = {&digest};
+    Progress progress("reading", info.dataSize, quiet, path);
+    if (info.dataSize > 0)
+        requireOK(DigestAudio(file, info, digests, [&] {
+            progress.advance(1 << 20); // it asks ahead of each MiB
+            return true;
+        }));
+    return digest.finish();
 }
 
 } // namespace
@@ -93,6 +120,8 @@ void requireNotTyped(const MeasuredFields& wanted, const std::vector<MetaStep>& 
         const std::string name = step.name.pattern(false);
         if (wanted.loudness && std::ranges::find(kLoudness, name, &LoudnessField::name) != kLoudness.end())
             throw UsageError(name + " is what --loudness measures");
+        if (wanted.md5 && name == "md5")
+            throw UsageError("md5 is what --md5 reckons");
         if (wanted.loudness && name == "bext.version" && step.number() != 2)
             throw UsageError("--loudness sets fields of version 2 of bext");
     }
@@ -101,13 +130,22 @@ void requireNotTyped(const MeasuredFields& wanted, const std::vector<MetaStep>& 
 MetaPlan planMeasured(const std::string& path, std::vector<MetaStep> steps, const MeasuredFields& wanted,
                       bool isLenient, bool quiet)
 {
+    if (!wanted.any())
+        return planMetadata(path, steps, isLenient);
     std::vector<UnmeasuredField> unmeasured;
     if (wanted.loudness) {
-        std::erase_if(steps, [](const MetaStep& step) { return step.name.text == "bext.version"; }); // which is 2
-        steps.push_back(versionStep());
-        planMetadata(path, steps, isLenient);
-        addLoudness(path, quiet, steps, unmeasured);
+        std::erase_if(steps, [](const MetaStep& step) { return step.name.text == "bext.version"; });
+        steps.push_back(metaStep("bext.version", "2", false));
     }
+    std::vector<MetaStep> tried = steps;
+    if (wanted.md5)
+        tried.push_back(digestStep(Bytes(16)));
+    planMetadata(path, tried, isLenient);
+    requireWhole(path);
+    if (wanted.loudness)
+        addLoudness(path, quiet, steps, unmeasured);
+    if (wanted.md5)
+        steps.push_back(digestStep(digestOf(path, quiet)));
     MetaPlan plan = planMetadata(path, steps, isLenient);
     plan.unmeasured = std::move(unmeasured);
     return plan;

@@ -7,7 +7,9 @@
 struct MeasuredFields {
     bool loudness = false; // the five of "bext" version 2 (EBU Tech 3285), by EBU R 128
 
-    bool any() const { return loudness; }
+    bool md5 = false; // the digest in "MD5 "
+
+    bool any() const { return loudness || md5; }
 };
 
 /// Throws UsageError where a step sets one that is measured, or a version of "bext" that has no loudness.

@@ -1,6 +1,7 @@
 #include "tool/meta/MetaFields.h"
 
 #include "tool/shared/output/DisplayWidth.h"
+#include "tool/shared/output/HexText.h"
 
 #include <algorithm>
 #include <charconv>
@@ -44,16 +45,6 @@ std::string fromLatin1(std::string_view bytes)
             text += static_cast<char>(0x80 | (byte & 0x3F));
         }
     }
-    return text;
-}
-
-std::string hexText(BytesView bytes)
-{
-    constexpr char digits[] = "0123456789abcdef";
-    std::string text;
-    text.reserve(2 * bytes.size());
-    for (const std::byte byte : bytes)
-        (text += digits[std::to_integer<unsigned>(byte) >> 4]) += digits[std::to_integer<unsigned>(byte) & 15];
     return text;
 }
 

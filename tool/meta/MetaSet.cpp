@@ -133,6 +133,7 @@ void declareMetaEdits(CommandLine& commandLine, Verb& meta)
                 "Take what the standards do not: texts that are not ASCII, other dates, unknown ids");
     set.addFlag("--loudness", toSet.measured.loudness,
                 "Measure the loudness of WAVE files by EBU R 128, and set the five fields of bext that tell of it");
+    set.addFlag("--md5", toSet.measured.md5, "Set md5 of WAVE files, by which info --check knows their sound again");
     declareEdit(commandLine, meta, "remove", "Remove fields, items of lists, or whole chunks by their group",
                 "The audio files, and the FIELDs to remove, as in info.ISFT, cue[2], bext", toRemove, runRemove);
 }

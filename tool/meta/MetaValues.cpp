@@ -128,21 +128,38 @@ MetaValue clockValue(const std::string& text, bool isLenient)
     return textValue(text, 8);
 }
 
+Bytes hexValue(std::string_view text, const char* expected)
+{
+    if (text.starts_with("0x") || text.starts_with("0X"))
+        text.remove_prefix(2);
+    Bytes bytes;
+    for (std::size_t i = 0; i < text.size(); i += 2) {
+        unsigned byte = 0;
+        const char* const end = text.data() + std::min(i + 2, text.size());
+        const auto read = std::from_chars(text.data() + i, end, byte, 16);
+        if (read.ec != std::errc() || read.ptr != text.data() + i + 2)
+            refuse(fmt::format("{} in hexadecimal expected, these are {} characters", expected, text.size()));
+        bytes.push_back(static_cast<std::byte>(byte));
+    }
+    return bytes;
+}
+
+/// A digest as it is written, RFC 1321.
+MetaValue digestValue(std::string_view text)
+{
+    constexpr std::size_t size = 16;
+    Bytes digest = hexValue(text, "16 bytes");
+    if (digest.size() != size)
+        refuse(fmt::format("16 bytes in hexadecimal expected, these are {} digits", text.size()));
+    return digest;
+}
+
 /// SMPTE ST 330: a label that begins with 06 0a 2b 34, and the size of the rest in its 13th byte.
 MetaValue umidValue(std::string_view text, bool isLenient)
 {
     constexpr std::size_t basic = 32, extended = 64;
-    if (text.starts_with("0x") || text.starts_with("0X"))
-        text.remove_prefix(2);
-    Bytes umid;
-    for (std::size_t i = 0; i + 1 < text.size(); i += 2) {
-        unsigned byte = 0;
-        const auto [end, error] = std::from_chars(text.data() + i, text.data() + i + 2, byte, 16);
-        if (error != std::errc() || end != text.data() + i + 2)
-            refuse("32 or 64 bytes in hexadecimal expected");
-        umid.push_back(static_cast<std::byte>(byte));
-    }
-    if ((umid.size() != basic && umid.size() != extended) || text.size() % 2 != 0)
+    const Bytes umid = hexValue(text, "32 or 64 bytes");
+    if (umid.size() != basic && umid.size() != extended)
         refuse(fmt::format("32 or 64 bytes in hexadecimal expected, these are {} digits", text.size()));
     constexpr std::array label{std::byte{0x06}, std::byte{0x0A}, std::byte{0x2B}, std::byte{0x34}};
     const std::byte rest = umid[12];
@@ -275,6 +292,8 @@ MetaValue metaValueFromText(MetaKind kind, MetaRange range, const std::string& t
         return clockValue(text, isLenient);
     case MetaKind::umid:
         return umidValue(text, isLenient);
+    case MetaKind::digest:
+        return digestValue(text);
     case MetaKind::time:
         return metaTimeFromText(text);
     case MetaKind::integer:

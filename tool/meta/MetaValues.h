@@ -32,6 +32,7 @@ enum class MetaKind {
     date,        // 2026-11-22
     clock,       // 10:44:00
     umid,        // 32 or 64 bytes in hexadecimal
+    digest,      // 16 bytes in hexadecimal
     time,        // MetaTime
     integer,     // from `least` to `most`
     decimal,     // likewise

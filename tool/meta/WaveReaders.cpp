@@ -305,6 +305,13 @@ bool readFact(const MetaChunk& chunk, const MetaSource& source, MetaFields& fiel
     return reader.ok();
 }
 
+/// Shown as a digest is written, which is the other way round than it is stored.
+bool readDigest(const MetaChunk& chunk, const MetaSource&, MetaFields& fields)
+{
+    fields.hex("", Bytes(chunk.body.rbegin(), chunk.body.rend()));
+    return true;
+}
+
 constexpr MetaReader kReaders[] = {
     {fourCC("bext"), "bext", readBroadcast},
     {fourCC("iXML"), "ixml", readIXML},
@@ -321,7 +328,7 @@ constexpr MetaReader kReaders[] = {
     {fourCC("fact"), "fact", readFact},
     {fourCC("PEAK"), "peak", readPeaks},
     {fourCC("LGWV"), "lgwv", readPreview},
-    {fourCC("MD5 "), "md5", readHex},
+    {fourCC("MD5 "), "md5", readDigest},
     {fourCC("UMID"), "umid", readHex},
     {fourCC("umid"), "umid", readHex},
     {fourCC("_PMX"), "xmp", readText},

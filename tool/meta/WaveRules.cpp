@@ -163,6 +163,22 @@ void removeLoop(MetaEdit& edit, const MetaStep& step)
     });
 }
 
+// "MD5 ":
+
+/// Stored the other way round than it is written, as a number that is little-endian.
+void setDigest(MetaEdit& edit, const MetaStep& step)
+{
+    const auto* const digest = std::get_if<Bytes>(&step.value);
+    if (digest == nullptr)
+        return removeChunk<fourCC("MD5 ")>(edit, step);
+    const Bytes body(digest->rbegin(), digest->rend());
+    MetaChunk* const chunk = edit.chunkOf(step, fourCC("MD5 "));
+    if (chunk == nullptr)
+        edit.add(fourCC("MD5 "), body);
+    else if (chunk->body != body)
+        edit.replace(*chunk, body);
+}
+
 using K = MetaKind;
 
 constexpr MetaRule kRules[] = {
@@ -212,6 +228,8 @@ constexpr MetaRule kRules[] = {
     {"smpl.loop[N].playCount", K::integer, {0, kMost32}, setLoop<&SamplerLoop::playCount>},
     {"smpl.loop[N]", K::none, {}, removeLoop},
     {"smpl", K::none, {}, removeChunk<fourCC("smpl")>},
+
+    {"md5", K::digest, {}, setDigest},
 };
 
 } // namespace

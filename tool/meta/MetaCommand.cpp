@@ -204,8 +204,9 @@ std::string lowered(std::string text)
     return text;
 }
 
-/// "bext,ixml" as groups; what is no group may be the id of a chunk.
-MetaGroups groupsFromText(const std::string& text)
+} // namespace
+
+MetaGroups metaGroupsFromText(const std::string& text)
 {
     const std::vector<std::string> known = metaGroups();
     MetaGroups groups;
@@ -220,6 +221,8 @@ MetaGroups groupsFromText(const std::string& text)
     }
     return groups;
 }
+
+namespace {
 
 bool runMeta(const FileArguments& files, const MetaOptions& wanted, const OutputOptions& options)
 {
@@ -239,7 +242,7 @@ void declareMeta(CommandLine& commandLine)
     Verb& verb = commandLine.addVerb("meta", "Show what files say about themselves, by field; set or remove fields",
                                      [&commandLine] {
                                          if (!only.empty())
-                                             wanted.only = groupsFromText(only);
+                                             wanted.only = metaGroupsFromText(only);
                                          return runMeta(files, wanted, commandLine.output());
                                      });
     CommandLine::addFilesOrInput(verb, files);
@@ -248,6 +251,8 @@ void declareMeta(CommandLine& commandLine)
     verb.addText("--only", only, "Only these, behind commas: bext, ixml, info, cue, smpl, … or ids of chunks")
         .label("GROUPS");
     declareMetaEdits(commandLine, verb);
+    declareMetaExport(commandLine, verb);
+    declareMetaImport(commandLine, verb);
 }
 
 const VerbRegistration registration{35, declareMeta};

@@ -1,8 +1,15 @@
-// ktfiles meta: what files say about themselves. Its objects are in files of their own.
+// What the verbs below `ktfiles meta` share.
 #pragma once
+
+#include "tool/meta/FileMetadata.h"
 
 class CommandLine;
 class Verb;
 
-/// "set" and "remove".
+/// `meta set` and `meta remove`.
 void declareMetaEdits(CommandLine& commandLine, Verb& meta);
+void declareMetaExport(CommandLine& commandLine, Verb& meta);
+void declareMetaImport(CommandLine& commandLine, Verb& meta);
+
+/// "bext,ixml" as groups; what is no group may be the id of a chunk. Throws UsageError.
+MetaGroups metaGroupsFromText(const std::string& text);

@@ -52,13 +52,6 @@ bool isList(std::string_view group)
     return std::ranges::find(lists, group) != lists.end();
 }
 
-bool fits(const MetaRule& rule, const MetaName& name)
-{
-    if (rule.pattern.ends_with('*'))
-        return !name.rest.empty() && name.pattern(false).starts_with(rule.pattern.substr(0, rule.pattern.size() - 1));
-    return rule.pattern == name.pattern(isList(name.group()));
-}
-
 /// Throws UsageError for what can stand in no brackets, whatever the file. Keys of CAF may have any.
 void requireIndices(const MetaName& name, bool isRemoval)
 {
@@ -275,10 +268,14 @@ void MetaEdit::touch(FourCC id)
 
 const MetaRule* ruleFor(const MetaName& name, FourCC container)
 {
+    const std::string ofChunk = name.pattern(false), ofItem = isList(name.group()) ? name.pattern(true) : ofChunk;
     for (const auto& rules : rulesOf(container))
-        for (const MetaRule& rule : rules)
-            if (fits(rule, name))
+        for (const MetaRule& rule : rules) {
+            const bool isOpen = rule.pattern.ends_with('*');
+            const std::string_view fixed = rule.pattern.substr(0, rule.pattern.size() - (isOpen ? 1 : 0));
+            if (isOpen ? !name.rest.empty() && ofChunk.starts_with(fixed) : rule.pattern == ofItem)
                 return &rule;
+        }
     return nullptr;
 }
 

@@ -29,29 +29,6 @@ std::vector<const MetaChunk*> chunksOf(const HeldMetadata& held, FourCC id)
     return chunks;
 }
 
-/// Compressed files, and containers of chunks that nobody here writes.
-HeldMetadata holdEdited(const std::string& path)
-{
-    const auto isEdited = [](FourCC container) {
-        constexpr std::array edited{kRIFF, kRF64, kBW64, kFORM, kCaff};
-        return std::ranges::find(edited, container) != edited.end();
-    };
-    CAudioFileIO file;
-    const ContainerProblem problem = OpenContainer(file, referenceTo(path), 0);
-    if (problem.kind == ContainerProblem::Kind::noContainer)
-        requireKnown(path); // says best what is wrong with what is no audio
-    HeldMetadata held;
-    if (!problem)
-        held = holdMetadata(path);
-    else if (problem.kind != ContainerProblem::Kind::noContainer && problem.kind != ContainerProblem::Kind::onlyRead)
-        requireNone(problem);
-    if (!isEdited(held.container))
-        throw OtherKind("metadata of its kind of file is only read; that of WAVE, RF64, BW64, AIFF, AIFC and CAF files "
-                        "is edited",
-                        OtherKind::Kind::audio);
-    return held;
-}
-
 /// Chunks keep their offset in the plan, by which the same one is known before and after.
 void addItems(MetaPlan& plan, FourCC id)
 {
@@ -138,6 +115,28 @@ std::unique_ptr<AudioFile> openItems(const std::string& path, AudioFile::Permiss
 }
 
 } // namespace
+
+HeldMetadata holdEdited(const std::string& path, const MetaGroups& groups)
+{
+    const auto isEdited = [](FourCC container) {
+        constexpr std::array edited{kRIFF, kRF64, kBW64, kFORM, kCaff};
+        return std::ranges::find(edited, container) != edited.end();
+    };
+    CAudioFileIO file;
+    const ContainerProblem problem = OpenContainer(file, referenceTo(path), 0);
+    if (problem.kind == ContainerProblem::Kind::noContainer)
+        requireKnown(path); // says best what is wrong with what is no audio
+    HeldMetadata held;
+    if (!problem)
+        held = holdMetadata(path, groups);
+    else if (problem.kind != ContainerProblem::Kind::noContainer && problem.kind != ContainerProblem::Kind::onlyRead)
+        requireNone(problem);
+    if (!isEdited(held.container))
+        throw OtherKind("metadata of its kind of file is only read; that of WAVE, RF64, BW64, AIFF, AIFC and CAF files "
+                        "is edited",
+                        OtherKind::Kind::audio);
+    return held;
+}
 
 namespace {
 

@@ -29,6 +29,10 @@ struct MetaPlan {
     HeldMetadata before, after;
 };
 
+/// What there is to edit. Throws Failure; OtherKind of compressed files, and of containers whose chunks nobody here
+/// writes.
+HeldMetadata holdEdited(const std::string& path, const MetaGroups& groups = {});
+
 /// Throws Failure.
 MetaPlan planMetadata(const std::string& path, const std::vector<MetaStep>& steps, bool isLenient);
 

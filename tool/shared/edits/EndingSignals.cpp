@@ -4,6 +4,8 @@
 #include "platform/SignalHold.h"
 #include "tool/shared/output/ProgressLine.h"
 
+#include <algorithm>
+#include <array>
 #include <atomic>
 #include <csignal>
 #include <ctime>
@@ -14,6 +16,15 @@ namespace {
 
 std::atomic<bool> isEnding = false;
 std::atomic<int> beingMade = 0; // temporary files, by other threads
+
+// One of two that are written in turns, so that the handler finds a whole one whenever it comes.
+struct LastWords {
+    std::array<char, 4096> text;
+    std::size_t size = 0;
+};
+std::array<LastWords, 2> lastWords;
+std::atomic<const LastWords*> wordsToSay = nullptr;
+static_assert(std::atomic<const LastWords*>::is_always_lock_free);
 static_assert(std::atomic<int>::is_always_lock_free && std::atomic<bool>::is_always_lock_free);
 
 // A thread that makes one for longer than half a second has a disk that will not keep it either.
@@ -30,6 +41,8 @@ extern "C" void removeTemporaryFiles(int signal)
     progressline::clearFromSignalHandler();
     awaitThoseBeingMade();
     CTemporaryFile::RemoveAllFromSignalHandler();
+    if (const LastWords* const words = wordsToSay) [[maybe_unused]]
+        const ssize_t written = ::write(STDERR_FILENO, words->text.data(), words->size);
     ::signal(signal, SIG_DFL);
     ::raise(signal);
 }
@@ -49,6 +62,14 @@ void removeTemporaryFilesAtEndingSignals()
             ::sigaction(signal, &action, nullptr);
         }
     });
+}
+
+void sayAtEndingSignals(const std::string& text)
+{
+    LastWords& words = lastWords[wordsToSay == lastWords.data() ? 1 : 0];
+    words.size = std::min(text.size(), words.text.size());
+    std::copy_n(text.data(), words.size, words.text.data());
+    wordsToSay = text.empty() ? nullptr : &words;
 }
 
 BeforeTheEnd::BeforeTheEnd()

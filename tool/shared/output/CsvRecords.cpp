@@ -38,10 +38,16 @@ std::string cellText(const platform::Value& value)
     return std::string(number.text());
 }
 
-void appendCell(std::string& row, const std::string& cell)
+void appendCellShown(std::string& row, const std::string& cell)
 {
     static const bool onTerminal = isTerminal(STDOUT_FILENO); // which must not take part of a name for a command
-    const std::string text = onTerminal ? printable(cell) : cell;
+    appendCsvCell(row, onTerminal ? printable(cell) : cell);
+}
+
+} // namespace
+
+void appendCsvCell(std::string& row, std::string_view text)
+{
     if (text.find_first_of(",\"\r\n") == text.npos) {
         row += text;
         return;
@@ -52,8 +58,6 @@ void appendCell(std::string& row, const std::string& cell)
     row += '"';
 }
 
-} // namespace
-
 std::string csvRow(CsvColumns columns, const Record& record)
 {
     std::string row;
@@ -61,7 +65,7 @@ std::string csvRow(CsvColumns columns, const Record& record)
         row += row.empty() && column == columns.front() ? "" : ",";
         if (const auto found = std::ranges::find(record.fields(), column, &Record::Field::name);
             found != record.fields().end())
-            appendCell(row, cellText(found->value));
+            appendCellShown(row, cellText(found->value));
     }
     return row.append(kLineEnd);
 }

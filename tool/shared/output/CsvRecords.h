@@ -17,6 +17,9 @@ std::string csvRow(CsvColumns columns, const Record& record);
 /// The row of a file that failed.
 std::string csvFailure(CsvColumns columns, const std::string& path, const std::string& text);
 
+/// One cell, in quotation marks where its text needs them.
+void appendCsvCell(std::string& row, std::string_view text);
+
 /// Writes nothing unless CSV is asked for.
 class CsvRecords {
 public:

@@ -26,7 +26,7 @@ def wave_file(text):
     info = b"INFO" + b"".join(chunk(name, word + b"\0") for name, word in zip((b"ISFT", b"IART", b"IART", b"INAM", b"ICMT"), words))
     info += chunk(b"ICOP", b"Latin-1 K\xe4se\0")
     adtl = b"adtl" + chunk(b"labl", struct.pack("<I", 9) + words[5] + b"\0") + chunk(b"note", struct.pack("<I", 5) + words[6] + b"\0")
-    adtl += chunk(b"ltxt", struct.pack("<II4sHHHH", 5, 24, b"rgn ", 49, 7, 1, 2) + words[7] + b"\0") + chunk(b"labl", struct.pack("<I", 77) + b"lost\0")
+    adtl += chunk(b"ltxt", struct.pack("<II4sHHHH", 5, 24, b"rgn ", 49, 7, 1, 2) + words[7] + b"\0")
     ixml = IXML.replace(b"Boom", words[8].replace(b"\r", b"").replace(b"\x1b", b"").strip().replace(b"<", b"&lt;"))
     return wave(chunk(b"bext", bext(words[9][:200], time_reference=48000 * 3600 + 7, history=b"A=PCM,F=48000\r\nA=MPEG1L2\r\n")), UNKNOWN, chunk(b"LIST", info),
                 chunk(b"cue ", struct.pack("<I", 2) + point(9, 48) + point(5, 96)), chunk(b"LIST", adtl), chunk(b"smpl", SAMPLER), chunk(b"acid", ACID),

@@ -1,6 +1,7 @@
 #include "audiofile/ChunkInventory.h"
 
 #include "audiofile/ContainerChanges.h"
+#include "audiofile/ContainerTail.h"
 #include "loops/tagging/ChunkIDs.h"
 #include "platform/OwnedDescriptor.h"
 #include "platform/SystemCalls.h"
@@ -133,8 +134,11 @@ ContainerProblem ChunkInventory::walk(const EditScope& scope)
     fileLength_ = extent.fileLength;
     // Less than a chunk header is no more than a pad byte that went astray.
     const auto headerSize = static_cast<std::int64_t>(extent.id == kCaff ? sizeof(CAFChunkHeader) : sizeof(ChkHeader));
-    if (!isUnfinished_ && fileLength_ - end_ >= headerSize)
-        entries_.push_back({0, end_, fileLength_ - end_});
+    if (isUnfinished_ || fileLength_ - end_ < headerSize)
+        return {};
+    ContainerTail tail;
+    if (ExamineContainerTail(file, tail) != kStatusOK || tail.fault != ContainerTail::Fault::none)
+        entries_.push_back({0, end_, fileLength_ - end_}); // not the room of an edit that was killed
     return {};
 }
 

@@ -1,5 +1,7 @@
 #include "audiofile/ContainerTail.h"
 
+#include "media/containers/ContainerHeaders.h"
+
 #include <algorithm>
 #include <limits>
 
@@ -40,6 +42,28 @@ ContainerTail::Fault faultOf(const ContainerTail& tail)
     return Fault::none;
 }
 
+/// What an edit in place leaves that is killed while it makes room behind the chunks: the header of filler, which no
+/// size counts yet, and zeros; in CAF, where the header counts at once, filler that is cut short.
+bool isUnfinishedRoom(CAudioFileIO& file, const ContainerTail& tail)
+{
+    constexpr std::int64_t most = 16 << 20; // more than an edit makes at a time
+    if (tail.fault == ContainerTail::Fault::cutShort)
+        return tail.last.id == kFree && tail.last.size >= 0;
+    if (tail.extent.id == kCaff || tail.fault != ContainerTail::Fault::stray || isOpenData(tail.last, false))
+        return false;
+    ChkHeader header;
+    constexpr std::int64_t headerSize = sizeof header;
+    if (tail.stray > most || file.Read(&header, tail.end, headerSize, nullptr) != kStatusOK)
+        return false;
+    const std::endian order = tail.extent.id == kFORM ? std::endian::big : std::endian::little;
+    if (inByteOrder<FourCC>(header.id, std::endian::big) != kFree ||
+        (tail.stray != headerSize && tail.stray != headerSize + inByteOrder<std::uint32_t>(header.size, order)))
+        return false;
+    Bytes bytes(static_cast<std::size_t>(tail.stray - headerSize));
+    return (bytes.empty() || file.Read(bytes.data(), tail.end + headerSize, std::ssize(bytes), nullptr) == kStatusOK) &&
+           std::ranges::all_of(bytes, [](std::byte byte) { return byte == std::byte{0}; });
+}
+
 } // namespace
 
 std::int32_t ExamineContainerTail(CAudioFileIO& file, ContainerTail& tail)
@@ -57,5 +81,12 @@ std::int32_t ExamineContainerTail(CAudioFileIO& file, ContainerTail& tail)
         tail.end = std::numeric_limits<std::int64_t>::max();
     tail.stray = tail.extent.fileLength - tail.end;
     tail.fault = faultOf(tail);
+    if (!isUnfinishedRoom(file, tail))
+        return kStatusOK;
+    if (tail.fault == ContainerTail::Fault::cutShort) {
+        tail.end = tail.last.offset;
+        tail.stray = tail.extent.fileLength - tail.end;
+    }
+    tail.fault = ContainerTail::Fault::none;
     return kStatusOK;
 }

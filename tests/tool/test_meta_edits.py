@@ -96,7 +96,8 @@ class MetaEdits(CommandTest):
             ("cue[0].lable=x", 'did you mean "cue[N].label"?', False), ("inst.gain=3", "inst is only read", False), ("acid.tempo=fast", "a number from", False),
             ("bext[new].originator=x", '"new" is no index here; [0] is the first', False), ("cue[x].label=x", '"x" is no index', False),
             ("smpl.loop[newer].start=1", '"newer" is no index', False), ("cue[new]=", '"new" is no index', False),
-            ("smpl.midiUnityNote=128", "from 0 to 127", False), ("cue[0]=3", "cannot be set, only removed", False),
+            ("smpl.midiUnityNote=128", "from 0 to 127", False), ("iart=x", 'did you mean "info.IART"?', False),
+            ("bext.originator=" + "é" * 99, "é" * 30 + "…: ASCII", False), ("cue[0]=3", "cannot be set, only removed", False),
         ]
         files = [  # of one file
             ("cue[2].label=x", "the last is [1]; [new] adds one", False), ("cue[new].label=x", "a new point needs its position", False),
@@ -234,6 +235,12 @@ class MetaEdits(CommandTest):
         before = (self.folder / "a.wav").stat().st_ino
         self.assertEqual(self.lines("meta", "remove", "a.wav", "acid", "info.IART", "cue[7]"), ["a.wav: unchanged"])
         self.assertEqual((self.folder / "a.wav").stat().st_ino, before)
+
+    def test_one_of_several_chunks_goes(self):
+        self.write("a.wav", wave(chunk(b"acid", ACID), chunk(b"acid", ACID[:20] + struct.pack("<f", 90)), chunk(b"LIST", INFO), chunk(b"LIST", INFO)))
+        changes = self.changes("remove", "a.wav", "acid", "info[1]")
+        self.assertEqual((changes["acid.tempo"], changes["info[1].IART"], self.fields("a.wav")["acid.tempo"]), ((97.5, None), ("Somebody", None), 90))
+        self.assertFalse([name for name in changes if name.startswith(("acid[1]", "info."))], changes)
 
     def test_ixml_by_path(self):
         document = (b'\xef\xbb\xbf<?xml version="1.0" encoding="UTF-8"?>\r\n<BWFXML>\n\t<!-- <A> --><PROJECT>a &amp; b</PROJECT>\n\t<TRACK_LIST>\n'

@@ -51,7 +51,7 @@ void setInfo(MetaEdit& edit, const MetaStep& step)
     if (step.isRemoval() && !stands)
         return;
     if (!stands && !edit.isLenient() && std::ranges::find(kKeys, key) == kKeys.end())
-        MetaEdit::refuse(step, fmt::format("\"{}\" is no published key{}; --lenient writes it", printable(key),
+        MetaEdit::refuse(step, fmt::format("\"{}\" is no published key (--lenient writes it){}", printable(key),
                                            didYouMean(key, kKeys)));
     if (step.isRemoval())
         texts.erase(key);
@@ -112,6 +112,8 @@ void setTextOf(CAFStringTable& table, CAFStringEntry& entry, const std::string& 
                          });
     const auto at = static_cast<std::ptrdiff_t>(begin);
     const bool hasRoom = isAlone && text.size() <= old.size() && at + std::ssize(old) < std::ssize(table.texts);
+    if (!hasRoom && table.missingEntries != 0) // what follows the entries would become one
+        MetaEdit::refuseDamaged(kStrings);
     if (isAlone)
         std::fill_n(table.texts.begin() + at, old.size(), std::byte{0});
     if (hasRoom) {

@@ -21,8 +21,9 @@ void requireKnown(const MetaEdit& edit, const MetaStep& step, const std::string&
     if (stands || edit.isLenient() || std::ranges::find(names, id) != names.end())
         return;
     const std::vector<std::string_view> known(names.begin(), names.end());
-    MetaEdit::refuse(step, fmt::format("\"{}\" is no registered id{}{}", id, didYouMean(id, known),
-                                       id.size() == 4 ? "; --lenient writes it" : ""));
+    MetaEdit::refuse(step,
+                     fmt::format("\"{}\" is no registered id{}{}", id,
+                                 id.size() == sizeof(FourCC) ? " (--lenient writes it)" : "", didYouMean(id, known)));
 }
 
 void setInfo(MetaEdit& edit, const MetaStep& step)
@@ -51,14 +52,8 @@ void setInfo(MetaEdit& edit, const MetaStep& step)
     putList(edit, chunk, list);
 }
 
-void removeInfo(MetaEdit& edit, const MetaStep& step)
-{
-    if (MetaChunk* const chunk = edit.chunkOf(step, kListId, InfoList::kForm))
-        edit.remove(*chunk);
-}
-
 constexpr MetaRule kRules[] = {
-    {"info", MetaKind::none, {}, removeInfo},
+    {"info", MetaKind::none, {}, removeChunk<kListId, InfoList::kForm>},
     {"info.*", MetaKind::text, {0, kNoLimit}, setInfo},
 };
 

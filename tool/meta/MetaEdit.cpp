@@ -31,6 +31,18 @@ bool goesBefore(const MetaStep& a, const MetaStep& b)
     return a.name.parts.size() > b.name.parts.size();
 }
 
+/// As it was typed; a long text is told by its beginning.
+std::string inWords(const std::string& name, const std::optional<std::string>& text)
+{
+    constexpr std::size_t most = 60;
+    if (!text)
+        return printable(name);
+    std::size_t end = std::min(text->size(), most);
+    while (end < text->size() && (static_cast<unsigned char>((*text)[end]) & 0xC0) == 0x80)
+        ++end; // not within a character
+    return fmt::format("{}={}{}", printable(name), printable(text->substr(0, end)), end < text->size() ? "…" : "");
+}
+
 using RuleLists = std::vector<std::span<const MetaRule>>;
 
 RuleLists rulesOf(FourCC container)
@@ -256,8 +268,7 @@ std::uint64_t MetaEdit::framesWithinSound(const MetaStep& step) const
 
 void MetaEdit::refuse(const MetaStep& step, const std::string& why)
 {
-    throw Failure(fmt::format("{}{}{}: {}", printable(step.name.text), step.text ? "=" : "",
-                              printable(step.text.value_or("")), why));
+    throw Failure(fmt::format("{}: {}", inWords(step.name.text, step.text), why));
 }
 
 void MetaEdit::touch(FourCC id)
@@ -297,7 +308,7 @@ MetaStep metaStep(const std::string& name, const std::optional<std::string>& tex
             } catch (const UsageError& error) {
                 why = error.what();
             }
-    throw UsageError(fmt::format("{}={}: {}", printable(name), printable(*text), why));
+    throw UsageError(fmt::format("{}: {}", inWords(name, text), why));
 }
 
 bool isEditedField(const std::string& name)
@@ -310,6 +321,9 @@ std::string whyNotEdited(const std::string& name)
 {
     const auto parsed = metaNameFromText(name);
     const std::vector<std::string_view> known = knownPatterns();
+    for (const FourCC id : InfoList::knownIds())
+        if (equalIgnoringASCIICase(fourCCText(id), name))
+            return fmt::format(", did you mean \"info.{}\"?", fourCCText(id));
     if (parsed)
         if (const std::string nearest = didYouMean(parsed->pattern(true), known); !nearest.empty())
             return nearest;

@@ -129,12 +129,16 @@ void checkLoop(MetaEdit& edit, const MetaStep& step);
 
 // Parts of rules:
 
-/// Removes the whole chunk that a step names.
-template <FourCC id>
+/// Removes the whole chunk that a step names. Others of its kind have other indices then.
+template <FourCC id, FourCC form = 0>
 void removeChunk(MetaEdit& edit, const MetaStep& step)
 {
-    if (MetaChunk* const chunk = edit.find(id, step.name.parts.front().number().value_or(0)))
-        edit.remove(*chunk);
+    MetaChunk* const chunk = edit.chunkOf(step, id, form);
+    if (chunk == nullptr)
+        return;
+    edit.remove(*chunk);
+    if (edit.find(id, 0, form) != nullptr)
+        edit.itemRemoved(step, 0);
 }
 
 /// Puts text in the place of what stands ahead of the first NUL; where NULs only follow they make room, or fill it up,

@@ -13,6 +13,7 @@
 
 #include <algorithm>
 #include <array>
+#include <cmath>
 #include <limits>
 #include <set>
 
@@ -53,6 +54,16 @@ bool isBelow(std::string_view field, std::string_view item)
     return field.starts_with(item) && (field.size() == item.size() || field[item.size()] == '.');
 }
 
+/// As numbers are shown: what is none is as any other that is none.
+bool isSame(const MetaField::Value& a, const MetaField::Value& b)
+{
+    const auto isNone = [](const MetaField::Value& value) {
+        const auto* const number = std::get_if<double>(&value);
+        return number != nullptr && std::isnan(*number);
+    };
+    return a == b || (isNone(a) && isNone(b));
+}
+
 /// What fields say that were there, are there, or both. Where an item went by its index, the names of what follows say
 /// something else now, which is no change: of its group the item's own fields count, and those that were set.
 std::vector<MetaChange> changesOf(const MetaPlan& plan, const std::vector<std::string>& removedItems,
@@ -71,7 +82,7 @@ std::vector<MetaChange> changesOf(const MetaPlan& plan, const std::vector<std::s
     for (const MetaField& field : fieldsAfter) {
         const std::string name = field.fullName();
         const auto old = before.find(name);
-        if (shifted.contains(field.group) || (old != before.end() && old->second->value == field.value))
+        if (shifted.contains(field.group) || (old != before.end() && isSame(old->second->value, field.value)))
             continue;
         changes.push_back({name, old != before.end() ? std::optional(old->second->value) : std::nullopt, field.value});
     }

@@ -235,8 +235,9 @@ std::optional<std::size_t> MetaEdit::itemOf(const MetaStep& step, std::size_t pa
         return std::nullopt;
     if (!index)
         refuse(step, fmt::format("\"{}\" is no index; [0] is the first, [new] one behind the last", item.index));
-    refuse(step,
-           count == 0 ? "there is none; [new] adds one" : fmt::format("the last is [{}]; [new] adds one", count - 1));
+    const std::string next = makesNext_ ? std::to_string(count) : "new";
+    refuse(step, count == 0 ? fmt::format("there is none; [{}] adds one", next)
+                            : fmt::format("the last is [{}]; [{}] adds one", count - 1, next));
 }
 
 void MetaEdit::itemRemoved(const MetaStep& step, std::size_t part)

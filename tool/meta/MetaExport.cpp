@@ -43,11 +43,11 @@ public:
     void requireOther(const std::string& path)
     {
         struct stat status = {};
-        if (isThere_ && ::stat(path.c_str(), &status) == 0 && status.st_dev == replaced_.st_dev &&
-            status.st_ino == replaced_.st_ino)
-            isRefused_ = true;
-        if (isRefused_)
-            throw Failure("the table would be written over the file itself");
+        if (!isThere_ || ::stat(path.c_str(), &status) != 0 || status.st_dev != replaced_.st_dev ||
+            status.st_ino != replaced_.st_ino)
+            return;
+        isRefused_ = true;
+        throw Failure("the table would be written over the file itself");
     }
     void finish()
     {
@@ -85,9 +85,10 @@ bool writeTable(const ExportArguments& arguments, const OutputOptions& options)
         writer = std::make_unique<MetaCSVWriter>(sink, arguments.isMarked);
     const FileLoop loop{.threads = arguments.threads, .doing = "exporting", .quiet = options.quiet};
     const bool good = writeFileByFile(*writer, arguments.files, loop, [&](const FoundFile& file) {
-        output.requireOther(file.path);
         const FileAccess access = accessForReading(file.path, {.quiet = options.quiet});
-        return cellsOf(holdEdited(file.path, groups), groups);
+        const HeldMetadata held = holdEdited(file.path, groups);
+        output.requireOther(file.path);
+        return cellsOf(held, groups);
     });
     output.finish();
     return good;

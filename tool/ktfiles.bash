@@ -55,7 +55,7 @@ _ktfiles()
         elif ((cword == 3)) && [[ $object == tags ]]; then
             COMPREPLY=($(compgen -W 'set remove copy' -- "$cur"))
         elif ((cword == 3)) && [[ $object == meta ]]; then
-            COMPREPLY=($(compgen -W 'set remove export import' -- "$cur"))
+            COMPREPLY=($(compgen -W 'set remove copy export import' -- "$cur"))
         elif ((cword == 3)) && [[ $object == project ]]; then
             COMPREPLY=($(compgen -W "$projects" -- "$cur"))
         fi
@@ -75,6 +75,7 @@ _ktfiles()
             scan/*) COMPREPLY=($(compgen -W "--csv --threads $files $common" -- "$cur")) ;;
             meta/set) COMPREPLY=($(compgen -W "--lenient --loudness --md5 $files $edit $common" -- "$cur")) ;;
             meta/remove) COMPREPLY=($(compgen -W "$files $edit $common" -- "$cur")) ;;
+            meta/copy) COMPREPLY=($(compgen -W "--only --lenient $files $edit $common" -- "$cur")) ;;
             meta/export) COMPREPLY=($(compgen -W "--csv --xml --bom --output --force --only --threads $files $common" -- "$cur")) ;;
             meta/import) COMPREPLY=($(compgen -W "--empty-removes --lenient $edit $common" -- "$cur")) ;;
             meta/*) COMPREPLY=($(compgen -W "--only --csv --threads $files $common" -- "$cur")) ;;
@@ -114,7 +115,7 @@ _ktfiles()
         elif ((cword > 3)) && [[ $verb/$object == meta/remove ]]; then
             COMPREPLY+=($(compgen -W "$fields" -- "$cur"))
         elif ((cword == 2)) && [[ $verb == meta ]]; then
-            COMPREPLY+=($(compgen -W 'set remove export import' -- "$cur"))
+            COMPREPLY+=($(compgen -W 'set remove copy export import' -- "$cur"))
         elif ((cword == 2)) && [[ $verb == tags ]]; then
             COMPREPLY+=($(compgen -W 'set remove copy' -- "$cur"))
         elif ((cword == 2)) && [[ $verb == chunks ]]; then

@@ -27,7 +27,7 @@ def name_of(arguments):
         return OBJECTS[item]
     if verb == "tags" and item in ("set", "remove", "copy"):
         return "tags-edit"
-    if verb == "meta" and item in ("set", "remove", "import"):
+    if verb == "meta" and item in ("set", "remove", "import", "copy"):
         return "meta-edit"
     if verb == "project" and item in ("backup", "restore", "settle", "rename-alternative"):
         return "project-edit"

@@ -250,6 +250,42 @@ class Bulk(CommandTest):
         self.assertEqual(((self.folder / "t.xml").read_bytes(), (self.folder / "a.wav").read_bytes()), (table, sound))
         self.assertEqual(self.lines("meta", "import", "-", stdin=table), ["./a.wav: unchanged"])
 
+    def test_fields_go_from_file_to_file(self):
+        plain = iter(TEXTS[:1] * 99)
+        source = wave_file(plain).replace(b"SEG1" + struct.pack("<I", 4800), b"SEG1" + struct.pack("<I", 48))
+        self.write("a.wav", source)
+        theirs = wave(chunk(b"LIST", b"INFO" + chunk(b"IGNR", b"mine\0") + chunk(b"IART", b"theirs\0")), UNKNOWN,
+                      chunk(b"cue ", struct.pack("<I", 3) + point(1, 1) + point(2, 2) + point(9, 3)), frames=300)
+        self.write("b.wav", theirs.replace(struct.pack("<II", 48000, 96000), struct.pack("<II", 96000, 192000)))
+        self.run_command("meta", "copy", "a.wav", "b.wav")
+        wanted, found = (dict(self.fields(name)[name]) for name in ("a.wav", "b.wav"))
+        moved = {name for name in wanted if re.search(r"position$|timeReference$|loop\[0\]\.(start|end)$|cue\[\d\]\.length$", name)}
+        expected = {name: value * 2 if name in moved else value for name, value in wanted.items()} | {"info.IGNR": "mine", "smpl.samplePeriod": 10417, "acid.unknown": 32768}
+        self.assertEqual(found, expected)
+        self.assertGreater(len(moved), 5)
+        self.assertIn(UNKNOWN, (self.folder / "b.wav").read_bytes())
+        self.assertEqual([record["changes"] for record in self.json("meta", "copy", "a.wav", "b.wav")], [[]])
+        for kind in ("aiff", "caf"):
+            self.write("a." + kind, KINDS[kind][0](plain))
+            self.write("b." + kind, aiff((b"NAME", b"old")) if kind == "aiff" else caf((b"info", struct.pack(">I", 1) + b"artist\0them\0")))
+            self.run_command("meta", "copy", "a." + kind, "b." + kind)
+            lists = [{name: value for name, value in self.fields(f"{letter}.{kind}")[f"{letter}.{kind}"]
+                      if not name.startswith(("strg", "uuid", "AbCd")) and name != "info.artist" and not (kind == "caf" and name.endswith(".id"))} for letter in "ab"]
+            self.assertEqual(*lists)
+        self.write("c.aiff", aiff())
+        self.write("c.caf", caf())
+        left = {record["path"]: record["notCopied"] for record in self.json("meta", "copy", "a.wav", "c.aiff", "c.caf", "--only", "info,cue,bext")}
+        self.assertEqual(left, dict.fromkeys(("c.aiff", "c.caf"), ["info.ISFT", "remarks on points and ranges", "bext"]))
+        found = dict(self.fields("c.caf")["c.caf"])
+        self.assertEqual([found.get(name) for name in ("info.title", "info.artist", "mark[0].position", "mark[0].name", "mark[1].position")], ["plain", "plain", 44, "plain", 88])
+        self.assertEqual(dict(self.fields("c.aiff")["c.aiff"])["NAME"], "plain")
+        before = (self.folder / "c.aiff").read_bytes()
+        self.write("long.wav", wave(chunk(b"cue ", struct.pack("<I", 1) + point(5, 4000)), frames=5000))
+        self.assertIn("the sound ends at frame", self.failure("meta", "copy", "long.wav", "c.aiff"))
+        self.write("none.wav", wave())
+        self.assertIn("no fields that can be copied", self.failure("meta", "copy", "none.wav", "c.aiff"))
+        self.assertEqual((self.folder / "c.aiff").read_bytes(), before)
+
     def test_an_interrupt_is_told_and_leaves_whole_files(self):
         names = [f"{i:03}.wav" for i in range(300)]
         old = wave(chunk(b"bext", bext(b"old")))

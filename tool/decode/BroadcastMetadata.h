@@ -3,7 +3,7 @@
 
 #include "platform/core/Bytes.h"
 #include "tool/decode/DecodeFormat.h"
-#include "tool/decode/SoundChange.h"
+#include "tool/shared/portable/SoundChange.h"
 
 #include <bit>
 #include <string>

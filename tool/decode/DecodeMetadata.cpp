@@ -3,9 +3,9 @@
 #include "audiofile/CAudioFileIO.h"
 #include "loops/tagging/CAFPayloads.h"
 #include "platform/core/ByteWriter.h"
-#include "tool/decode/PortableMarkers.h"
 #include "tool/shared/input/InputFile.h"
 #include "tool/shared/looptags/LoopTagFields.h"
+#include "tool/shared/portable/PortableMarkers.h"
 
 #include <fmt/format.h>
 

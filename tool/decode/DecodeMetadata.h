@@ -4,7 +4,7 @@
 
 #include "media/containers/ContainerTraits.h"
 #include "tool/decode/BroadcastMetadata.h"
-#include "tool/decode/PortableTexts.h"
+#include "tool/shared/portable/PortableTexts.h"
 
 #include <span>
 #include <string>

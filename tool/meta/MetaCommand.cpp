@@ -251,6 +251,7 @@ void declareMeta(CommandLine& commandLine)
     verb.addText("--only", only, "Only these, behind commas: bext, ixml, info, cue, smpl, … or ids of chunks")
         .label("GROUPS");
     declareMetaEdits(commandLine, verb);
+    declareMetaCopy(commandLine, verb);
     declareMetaExport(commandLine, verb);
     declareMetaImport(commandLine, verb);
 }

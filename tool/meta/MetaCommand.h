@@ -8,6 +8,7 @@ class Verb;
 
 /// `meta set` and `meta remove`.
 void declareMetaEdits(CommandLine& commandLine, Verb& meta);
+void declareMetaCopy(CommandLine& commandLine, Verb& meta);
 void declareMetaExport(CommandLine& commandLine, Verb& meta);
 void declareMetaImport(CommandLine& commandLine, Verb& meta);
 

@@ -37,6 +37,14 @@ std::string inWords(const std::vector<UnmeasuredField>& unmeasured)
     return text;
 }
 
+std::string inWords(const std::vector<std::string>& left)
+{
+    std::string text;
+    for (const std::string& each : left)
+        text += (text.empty() ? "; not copied, since there is no place for it: " : ", ") + each;
+    return text;
+}
+
 } // namespace
 
 MetaEdits::MetaEdits(const MetaEditWords& words, EditOptions options, const OutputOptions& output)
@@ -98,6 +106,8 @@ void MetaEdits::tell(const std::string& path, const MetaPlan& plan, const std::s
                 json.beginObject().member("field", each.field).member("why", each.why).endObject();
             json.endArray();
         }
+        if (!plan.left.empty())
+            json.member("notCopied", plan.left);
         json.member("dryRun", options_.dryRun).knownMember("backup", backup).endObject();
         json_.end();
     } else if (!output_.quiet) {
@@ -105,7 +115,8 @@ void MetaEdits::tell(const std::string& path, const MetaPlan& plan, const std::s
             plan.items.empty()
                 ? "unchanged"
                 : fmt::format("{} {}", options_.dryRun ? words_.dryRun : words_.done, inWords(plan.changes));
-        Output::standard().print("{}\n", printable(fmt::format("{}: {}{}{}{}", path, what, inWords(plan.unmeasured),
-                                                               backup.empty() ? "" : "; backup ", backup)));
+        Output::standard().print(
+            "{}\n", printable(fmt::format("{}: {}{}{}{}", path, what, inWords(plan.unmeasured) + inWords(plan.left),
+                                          backup.empty() ? "" : "; backup ", backup)));
     }
 }

@@ -26,6 +26,7 @@ struct MetaPlan {
     std::vector<MetaItemEdit> items; // those that are written in order of index, removals last
     std::vector<FourCC> ids;         // of the chunks that change
     std::vector<UnmeasuredField> unmeasured;
+    std::vector<std::string> left; // that the file has no place for, in words
     HeldMetadata before, after;
 };
 

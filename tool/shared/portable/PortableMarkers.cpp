@@ -1,4 +1,4 @@
-#include "tool/decode/PortableMarkers.h"
+#include "tool/shared/portable/PortableMarkers.h"
 
 #include "audiofile/metadata/AssociatedDataList.h"
 #include "audiofile/metadata/CAFMarkers.h"

@@ -1,4 +1,4 @@
-#include "tool/decode/PortableTexts.h"
+#include "tool/shared/portable/PortableTexts.h"
 
 #include "audiofile/metadata/CommentList.h"
 #include "audiofile/metadata/InfoList.h"

@@ -2,8 +2,8 @@
 #pragma once
 
 #include "platform/core/Bytes.h"
-#include "tool/decode/PortableTexts.h"
-#include "tool/decode/SoundChange.h"
+#include "tool/shared/portable/PortableTexts.h"
+#include "tool/shared/portable/SoundChange.h"
 
 #include <string>
 #include <unordered_set>

@@ -1,5 +1,6 @@
 #include "tool/meta/FileMetadata.h"
 
+#include "platform/core/ASCIICase.h"
 #include "tool/meta/TagReader.h"
 #include "tool/shared/input/InputFile.h"
 #include "tool/shared/output/Failure.h"
@@ -31,11 +32,6 @@ std::span<const MetaReader> readersOf(const ContainerExtent& extent)
     }
 }
 
-char asciiLower(char c)
-{
-    return c >= 'A' && c <= 'Z' ? static_cast<char>(c - 'A' + 'a') : c;
-}
-
 std::string lowered(std::string_view text)
 {
     std::string small(text);
@@ -58,9 +54,7 @@ const MetaReader* readerOf(FourCC id, std::span<const MetaReader> readers)
 
 bool isWanted(std::string_view group, const MetaGroups& groups)
 {
-    const auto isGroup = [group](const std::string& wanted) {
-        return std::ranges::equal(group, wanted, {}, asciiLower);
-    };
+    const auto isGroup = [group](const std::string& wanted) { return equalIgnoringASCIICase(group, wanted); };
     return groups.empty() || std::ranges::any_of(groups, isGroup);
 }
 

@@ -48,41 +48,38 @@ std::string fromLatin1(std::string_view bytes)
     return text;
 }
 
-std::size_t hashOf(const MetaField& field)
-{
-    constexpr std::hash<std::string_view> hash;
-    return hash(field.place) * 31 + hash(field.name);
-}
-
 } // namespace
 
-std::uint32_t MetaNameCounts::add(const std::vector<MetaField>& fields, std::size_t index)
+std::uint32_t MetaNameCounts::add(const std::vector<MetaField>& fields, std::size_t index, std::size_t placeHash)
 {
-    if (2 * (taken_ + 1) > slots_.size()) {
-        constexpr std::size_t least = 128;
-        const std::vector<Slot> before = std::exchange(slots_, std::vector<Slot>(std::max(least, 2 * slots_.size())));
-        for (const Slot& slot : before)
-            if (slot.field != 0)
-                slotFor(fields, fields[slot.field - 1]) = slot;
+    if (2 * (taken_ + 1) > slots_.size())
+        grow();
+    const MetaField& field = fields[index];
+    const std::size_t hash = placeHash * 31 + std::hash<std::string_view>()(field.name);
+    for (std::size_t at = hash;; ++at) {
+        Slot& slot = slots_[at & (slots_.size() - 1)];
+        if (slot.field == 0) {
+            slot = {hash, static_cast<std::uint32_t>(index + 1), 0};
+            ++taken_;
+        } else if (const MetaField& first = fields[slot.field - 1];
+                   slot.hash != hash || first.name != field.name || first.place != field.place) {
+            continue;
+        }
+        return slot.count++;
     }
-    Slot& slot = slotFor(fields, fields[index]);
-    if (slot.field == 0) {
-        slot.field = static_cast<std::uint32_t>(index + 1);
-        ++taken_;
-    }
-    return slot.count++;
 }
 
-/// That of the field's name, or the free one where it belongs.
-MetaNameCounts::Slot& MetaNameCounts::slotFor(const std::vector<MetaField>& fields, const MetaField& field)
+void MetaNameCounts::grow()
 {
-    for (std::size_t at = hashOf(field);; ++at) {
-        Slot& slot = slots_[at & (slots_.size() - 1)];
+    constexpr std::size_t least = 128;
+    const std::vector<Slot> before = std::exchange(slots_, std::vector<Slot>(std::max(least, 2 * slots_.size())));
+    for (const Slot& slot : before) {
         if (slot.field == 0)
-            return slot;
-        const MetaField& first = fields[slot.field - 1];
-        if (first.name == field.name && first.place == field.place)
-            return slot;
+            continue;
+        std::size_t at = slot.hash;
+        while (slots_[at & (slots_.size() - 1)].field != 0)
+            ++at;
+        slots_[at & (slots_.size() - 1)] = slot;
     }
 }
 
@@ -91,6 +88,7 @@ void MetaFields::enter(const MetaChunk& chunk, std::string_view group)
     enterShared(chunk, group);
     if (const std::size_t count = places_[here_.group]++; count != 0)
         appendIndex(here_.place, count);
+    placeHash_ = std::hash<std::string>()(here_.place);
 }
 
 void MetaFields::enterShared(const MetaChunk& chunk, std::string_view group)
@@ -99,6 +97,7 @@ void MetaFields::enterShared(const MetaChunk& chunk, std::string_view group)
     here_.group = here_.place = group;
     here_.chunk = chunk.id;
     here_.offset = chunk.offset;
+    placeHash_ = std::hash<std::string>()(here_.place);
 }
 
 MetaField& MetaFields::add(std::string_view name, MetaField::Value value)
@@ -106,7 +105,7 @@ MetaField& MetaFields::add(std::string_view name, MetaField::Value value)
     MetaField& field = fields_.emplace_back(here_);
     field.name = isUTF8(name) ? std::string(name) : fromLatin1(name); // keys are texts of the file too
     field.value = std::move(value);
-    if (const std::uint32_t count = names_.add(fields_, fields_.size() - 1); count != 0)
+    if (const std::uint32_t count = names_.add(fields_, fields_.size() - 1, placeHash_); count != 0)
         appendIndex(field.name, count);
     return field;
 }

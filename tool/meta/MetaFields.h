@@ -58,14 +58,16 @@ struct MetaField {
 class MetaNameCounts {
 public:
     /// Counts one more field, `index` of `fields`, under the name that it has now; returns how many had it before.
-    std::uint32_t add(const std::vector<MetaField>& fields, std::size_t index);
+    /// `placeHash` is any hash of its place.
+    std::uint32_t add(const std::vector<MetaField>& fields, std::size_t index, std::size_t placeHash);
 
 private:
     struct Slot {
+        std::size_t hash = 0;
         std::uint32_t field = 0; // the first of the name, counted from 1; 0: free
         std::uint32_t count = 0;
     };
-    Slot& slotFor(const std::vector<MetaField>& fields, const MetaField& field);
+    void grow();
 
     std::vector<Slot> slots_; // a power of two, at most half of them taken
     std::size_t taken_ = 0;
@@ -110,12 +112,13 @@ public:
     std::vector<MetaField> take() { return std::move(fields_); }
 
 private:
-    static constexpr std::size_t kUsualFields = 64;
+    static constexpr std::size_t kUsualFields = 128;
 
     MetaField& add(std::string_view name, MetaField::Value value);
 
     double sampleRate_;
     MetaField here_; // the parts that fields share
+    std::size_t placeHash_ = 0;
     std::map<std::string, std::size_t> places_;
     MetaNameCounts names_;
     std::vector<MetaField> fields_;

@@ -308,6 +308,8 @@ bool readFact(const MetaChunk& chunk, const MetaSource& source, MetaFields& fiel
 /// Shown as a digest is written, which is the other way round than it is stored.
 bool readDigest(const MetaChunk& chunk, const MetaSource&, MetaFields& fields)
 {
+    if (chunk.body.size() != 16)
+        return false;
     fields.hex("", Bytes(chunk.body.rbegin(), chunk.body.rend()));
     return true;
 }

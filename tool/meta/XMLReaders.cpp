@@ -6,18 +6,24 @@
 
 #include <algorithm>
 #include <deque>
+#include <memory_resource>
 
 namespace {
 
+using Memory = std::pmr::memory_resource;
+
 struct Element {
-    std::string name;
-    std::string text; // from its first character that is no blank on
-    std::vector<std::pair<std::string, std::string>> attributes;
+    explicit Element(Memory* memory) : text(memory), attributes(memory) {}
+
+    std::string_view name;
+    std::pmr::string text; // from its first character that is no blank on
+    std::pmr::vector<std::pair<std::string_view, std::string_view>> attributes;
     std::size_t depth = 0;              // 0 of the root
     std::size_t index = 0;              // among those of its name in the same parent
     const std::size_t* likes = nullptr; // how many those are
     bool isInList = false;              // its parent's name says so
 };
+using Elements = std::pmr::deque<Element>; // in the order in which they begin; they stay where they are
 
 constexpr std::string_view kBlanks = " \t\r\n";
 
@@ -28,21 +34,22 @@ public:
     static constexpr std::size_t kLongestPath = 1000;
 
     void watch(platform::XMLParser& parser) { parser_ = &parser; }
+    const Elements& elements() const { return elements_; }
     void startElement(std::string_view name, const platform::XMLAttributes& attributes) override
     {
         pathLength_ += name.size();
-        if (elements.size() == kMostElements || pathLength_ > kLongestPath)
+        if (elements_.size() == kMostElements || pathLength_ > kLongestPath)
             return parser_->abort();
-        Element& element = elements.emplace_back();
-        element.name = name;
-        element.depth = open_.size();
-        element.isInList = !open_.empty() && open_.back()->name.ends_with("_LIST");
         const Element* const parent = open_.empty() ? nullptr : open_.back();
+        Element& element = elements_.emplace_back(&memory_);
+        element.name = kept(name);
+        element.depth = open_.size();
+        element.isInList = parent != nullptr && parent->name.ends_with("_LIST");
         std::size_t& likes = likes_[{parent, element.name}];
         element.index = likes++;
         element.likes = &likes;
         for (const platform::XMLAttribute& attribute : attributes)
-            element.attributes.emplace_back(attribute.name, attribute.value);
+            element.attributes.emplace_back(kept(attribute.name), kept(attribute.value));
         open_.push_back(&element);
     }
     void endElement(std::string_view name) override
@@ -52,19 +59,25 @@ public:
     }
     void characters(std::string_view text) override
     {
-        std::string& all = open_.back()->text;
+        std::pmr::string& all = open_.back()->text;
         if (all.empty())
             text.remove_prefix(std::min(text.find_first_not_of(kBlanks), text.size()));
         all += text;
     }
 
-    std::deque<Element> elements; // in the order in which they begin; they stay where they are
-
 private:
-    platform::XMLParser* parser_ = nullptr;
+    std::string_view kept(std::string_view text)
+    {
+        auto* const to = static_cast<char*>(memory_.allocate(text.size() + 1, 1));
+        return {to, text.copy(to, text.size())};
+    }
+
+    std::pmr::monotonic_buffer_resource memory_; // given back at once, which so many small pieces are not quickly
+    Elements elements_{&memory_};
+    std::pmr::map<std::pair<const Element*, std::string_view>, std::size_t> likes_{&memory_}; // by parent and name
     std::vector<Element*> open_;
-    std::map<std::pair<const Element*, std::string_view>, std::size_t> likes_; // by parent and name
-    std::size_t pathLength_ = 0;                                               // of the names of the open elements
+    std::size_t pathLength_ = 0; // of the names of the open elements
+    platform::XMLParser* parser_ = nullptr;
 };
 
 /// Writers fill chunks up with NULs.
@@ -88,7 +101,7 @@ bool hasIndex(const Element& element)
 }
 
 /// The root is the document, and no part of a path.
-void addElements(const std::deque<Element>& elements, MetaFields& fields)
+void addElements(const Elements& elements, MetaFields& fields)
 {
     std::string path;
     std::vector<std::size_t> ends; // of the path of the element that is open at each depth
@@ -103,8 +116,11 @@ void addElements(const std::deque<Element>& elements, MetaFields& fields)
                 appendIndex(path, element.index);
         }
         ends.back() = path.size();
-        for (const auto& [attribute, value] : element.attributes)
-            fields.text(path + (path.empty() ? "@" : ".@") + attribute, value);
+        for (const auto& [attribute, value] : element.attributes) {
+            (path += path.empty() ? "@" : ".@") += attribute;
+            fields.text(path, value);
+            path.resize(ends.back());
+        }
         fields.text(path, std::string_view(element.text).substr(0, element.text.find_last_not_of(kBlanks) + 1));
     }
 }
@@ -116,7 +132,7 @@ bool readIXML(const MetaChunk& chunk, const MetaSource& source, MetaFields& fiel
     TreeHandler handler;
     if (!parse(chunk.body, handler))
         return readText(chunk, source, fields);
-    addElements(handler.elements, fields);
+    addElements(handler.elements(), fields);
     return true;
 }
 

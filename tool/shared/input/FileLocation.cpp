@@ -3,17 +3,33 @@
 #include "tool/shared/input/StandardInput.h"
 #include "tool/shared/output/Failure.h"
 
-#include <filesystem>
-#include <system_error>
+#include <cerrno>
+#include <climits>
+#include <unistd.h>
+
+namespace {
+
+std::string absolutePath(const std::string& path)
+{
+    if (path.starts_with('/'))
+        return path;
+    if (path.empty())
+        throw Failure(systemErrorText(ENOENT));
+    char buffer[PATH_MAX]; // the system has no longer ones for it
+    if (::getcwd(buffer, sizeof buffer) == nullptr)
+        throw Failure(systemErrorText(errno));
+    std::string folder = buffer;
+    if (!folder.ends_with('/'))
+        folder += '/';
+    return folder + path;
+}
+
+} // namespace
 
 platform::URLRef fileLocation(const std::string& name)
 {
-    const std::string path = systemPath(name);
-    std::error_code error;
     // Not by way of CFileRef's paths, in which a "~" at the start means a home folder: the shell has read that already.
-    const std::string absolute = path.starts_with('/') ? path : std::filesystem::absolute(path, error).string();
-    if (error)
-        throw Failure(systemErrorText(error.value()));
+    const std::string absolute = absolutePath(systemPath(name));
     platform::URLRef url = platform::URL::createWithFileSystemBytes(absolute, false);
     if (!url)
         throw Failure("its path cannot be a file URL");

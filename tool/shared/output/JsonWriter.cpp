@@ -8,6 +8,32 @@
 
 namespace {
 
+constexpr std::size_t kShort = 256; // what is longer need not go in one piece
+
+constexpr std::uint64_t eight(unsigned char c)
+{
+    return 0x0101010101010101U * c;
+}
+
+/// Whether one of eight bytes, all below 0x80, is below `c`.
+constexpr bool anyBelow(std::uint64_t bytes, unsigned char c)
+{
+    return ((bytes - eight(c)) & eight(0x80)) != 0;
+}
+
+/// Whether it can stand in JSON as it is: printable ASCII, but for the quotation mark and the backslash.
+bool isPlain(std::string_view text)
+{
+    for (std::size_t i = 0; i < text.size(); i += sizeof(std::uint64_t)) {
+        std::uint64_t bytes = eight('a');
+        std::memcpy(&bytes, text.data() + i, std::min(sizeof bytes, text.size() - i));
+        if ((bytes & eight(0x80)) != 0 || anyBelow(bytes, 0x20) || anyBelow(bytes ^ eight('"'), 1) ||
+            anyBelow(bytes ^ eight('\\'), 1) || anyBelow(bytes ^ eight(0x7F), 1))
+            return false;
+    }
+    return true;
+}
+
 std::string base64(const Bytes& bytes)
 {
     constexpr char digits[] = "ABCDEFGHIJKLMNOPQRSTUVWXYZabcdefghijklmnopqrstuvwxyz0123456789+/";
@@ -26,15 +52,22 @@ std::string base64(const Bytes& bytes)
 
 JsonWriter& JsonWriter::write(std::string_view text)
 {
-    const bool isPlain =
-        std::all_of(text.begin(), text.end(), [](char c) { return c >= 0x20 && c < 0x7F && c != '"' && c != '\\'; });
+    const bool plain = isPlain(text);
     separate();
-    put('"');
-    if (isPlain)
-        put(text);
-    else
-        putEscaped(text);
-    put('"');
+    if (plain && text.size() < kShort) {
+        char* const to = room(text.size() + 2);
+        to[0] = '"';
+        std::memcpy(to + 1, text.data(), text.size());
+        to[text.size() + 1] = '"';
+        advance(text.size() + 2);
+    } else {
+        put('"');
+        if (plain)
+            put(text);
+        else
+            putEscaped(text);
+        put('"');
+    }
     isFirst_ = false;
     return *this;
 }

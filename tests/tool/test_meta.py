@@ -68,7 +68,7 @@ FIELDS = {
     "peak.timeStamp": 0, "peak.channel[0].value": 0.5, "peak.channel[0].position": 24, "md5": bytes(range(16))[::-1].hex(), "xmp": "<x/>",
     "strc": "00" * 32, "AbCd": b"to\1you".hex(), "bext[1].description": "again", "bext[1].originator": "somebody",
     "bext[1].originatorReference": "REF-1", "bext[1].originationDate": "2026-11-22", "bext[1].originationTime": "10:44:00",
-    "bext[1].timeReference": 0, "bext[1].version": 0,
+    "bext[1].timeReference": 0, "bext[1].version": 0, "bext[1].reserved": UMID.hex(),  # of which version 0 knows nothing
 }
 
 
@@ -139,6 +139,7 @@ class Meta(CommandTest):
             "inst.lowVelocity": 1, "inst.highVelocity": 127, "inst.gain": -6, "inst.sustainLoop.mode": 1, "inst.sustainLoop.beginMarker": 1,
             "inst.sustainLoop.begin": 10, "inst.sustainLoop.endMarker": 2, "inst.sustainLoop.end": 4000, "inst.releaseLoop.mode": 0,
             "aesd": "00" * 24, "appl.signature": "stoc", "appl.data": b"data".hex(), "midi": "f07ef7"})
+        self.assertEqual(self.fields("a.aiff", "--only", "inst")["inst.sustainLoop.end"], 4000)  # which "MARK" says
         words = {item["field"]: item.get("words") for item in self.record("meta", "a.aiff")["fields"]}
         self.assertEqual(words["comt[0].timeStamp"], "2024-01-01T00:00:00Z")
 
@@ -170,6 +171,7 @@ class Meta(CommandTest):
             "inst.baseNote": 60.0, "inst.lowNote": 0, "inst.highNote": 127, "inst.lowVelocity": 1, "inst.highVelocity": 127, "inst.gain": -6.0,
             "inst.startRegion": 8, "inst.instrumentId": 7, "edct.editCount": 3, "chan.layoutTag": 6553601, "chan.bitmap": 0,
             "peak.editCount": 3, "peak.channel[0].value": 0.5, "peak.channel[0].position": 50, "umid": UMID.hex(),
+            "umid.label": UMID[:12].hex(), "umid.instance": "aabbcc", "umid.material": UMID[16:].hex(),
             "uuid.id": bytes(range(16)).hex(), "uuid.data": b"abc".hex(), "zzzz": ""})
 
     def test_other_programs_read_the_same(self):

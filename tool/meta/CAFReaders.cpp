@@ -131,12 +131,16 @@ bool readChannels(const MetaChunk& chunk, const MetaSource&, MetaFields& fields)
         return false;
     fields.number("layoutTag", tag);
     fields.number("bitmap", bitmap);
-    for (std::size_t i = 0; i < count && reader.remaining() >= descriptionSize; ++i) {
-        fields.number(itemName("channel", i) + "label", reader.read<std::uint32_t>());
-        fields.number(itemName("channel", i) + "flags", reader.read<std::uint32_t>());
+    std::size_t read = 0;
+    for (; read < count && reader.remaining() >= descriptionSize; ++read) {
+        const std::string item = itemName("channel", read);
+        fields.number(item + "label", reader.read<std::uint32_t>());
+        fields.number(item + "flags", reader.read<std::uint32_t>());
         for (const char* const coordinate : {"x", "y", "z"})
-            fields.number(itemName("channel", i) + coordinate, reader.read<float>());
+            fields.number(item + coordinate, reader.read<float>());
     }
+    fields.missing(count - read);
+    fields.behind(reader.take(reader.remaining()));
     return true;
 }
 
@@ -153,6 +157,7 @@ bool readPeakPositions(const MetaChunk& chunk, const MetaSource&, MetaFields& fi
         fields.number(itemName("channel", i) + "value", reader.read<float>());
         fields.frames(itemName("channel", i) + "position", reader.read<std::uint64_t>());
     }
+    fields.behind(reader.take(reader.remaining()));
     return true;
 }
 
@@ -160,9 +165,11 @@ bool readEditCount(const MetaChunk& chunk, const MetaSource&, MetaFields& fields
 {
     ByteReader reader(chunk.body);
     const auto count = reader.read<std::uint32_t>();
-    if (reader.ok())
-        fields.number("editCount", count);
-    return reader.ok();
+    if (!reader.ok())
+        return false;
+    fields.number("editCount", count);
+    fields.behind(reader.take(reader.remaining()));
+    return true;
 }
 
 bool readOwn(const MetaChunk& chunk, const MetaSource&, MetaFields& fields)
@@ -184,7 +191,7 @@ constexpr MetaReader kReaders[] = {
     {fourCC("inst"), "inst", readInstrument, fourCC("strg")},
     {fourCC("chan"), "chan", readChannels},
     {fourCC("midi"), "midi", readPreview},
-    {fourCC("umid"), "umid", readHex},
+    {fourCC("umid"), "umid", readUMID},
     {fourCC("ovvw"), "ovvw", readPreview},
     {fourCC("peak"), "peak", readPeakPositions},
     {fourCC("edct"), "edct", readEditCount},

@@ -1,12 +1,56 @@
+#include "audiofile/metadata/ListChunk.h"
 #include "platform/core/ByteReader.h"
 #include "platform/core/Status.h"
 #include "tool/meta/MetaReaders.h"
 #include "tool/meta/TagReader.h"
 
+#include <algorithm>
+
 bool readText(const MetaChunk& chunk, const MetaSource&, MetaFields& fields)
 {
     const std::string_view text = textOf(chunk.body);
     fields.text("", text.substr(0, text.find_last_not_of('\0') + 1));
+    return true;
+}
+
+bool anySet(BytesView bytes)
+{
+    return std::ranges::any_of(bytes, [](std::byte byte) { return byte != std::byte{0}; });
+}
+
+/// SMPTE ST 330: a label, the length of what follows, a number of the instance and one of the material; of 64 bytes
+/// also where and when.
+void addUMID(const std::string& name, BytesView umid, MetaFields& fields)
+{
+    constexpr std::size_t basic = 32;
+    const bool isExtended = anySet(umid.subspan(basic));
+    const auto nameOf = [&](std::string_view word) {
+        std::string text = name + std::string(word);
+        if (name.empty())
+            text.front() = static_cast<char>(text.front() - 'A' + 'a');
+        return text;
+    };
+    fields.hex(name, isExtended ? umid : umid.first(basic));
+    fields.hex(nameOf("Label"), umid.first(12));
+    fields.hex(nameOf("Instance"), umid.subspan(13, 3));
+    fields.hex(nameOf("Material"), umid.subspan(16, 16));
+    if (!isExtended)
+        return;
+    fields.hex(nameOf("Time"), umid.subspan(32, 8));
+    fields.hex(nameOf("Place"), umid.subspan(40, 12));
+    fields.text(nameOf("Country"), textUpToNUL(umid.subspan(52, 4)));
+    fields.text(nameOf("Organization"), textUpToNUL(umid.subspan(56, 4)));
+    fields.text(nameOf("User"), textUpToNUL(umid.subspan(60, 4)));
+}
+
+bool readUMID(const MetaChunk& chunk, const MetaSource&, MetaFields& fields)
+{
+    constexpr std::size_t basic = 32, extended = 64;
+    if (chunk.body.size() != basic && chunk.body.size() != extended)
+        return false;
+    Bytes umid = chunk.body;
+    umid.resize(extended);
+    addUMID("", umid, fields);
     return true;
 }
 
@@ -53,5 +97,6 @@ bool readPeaks(const MetaChunk& chunk, const MetaSource& source, MetaFields& fie
         fields.number(item + "value", reader.read<float>());
         fields.frames(item + "position", std::uint64_t{reader.read<std::uint32_t>()});
     }
+    fields.behind(reader.take(reader.remaining()));
     return true;
 }

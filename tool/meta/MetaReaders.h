@@ -52,8 +52,14 @@ bool readADM(const MetaChunk& chunk, const MetaSource& source, MetaFields& field
 /// The whole body up to NULs at its end.
 bool readText(const MetaChunk& chunk, const MetaSource& source, MetaFields& fields);
 bool readHex(const MetaChunk& chunk, const MetaSource& source, MetaFields& fields);
+/// SMPTE ST 330, of 32 or 64 bytes.
+bool readUMID(const MetaChunk& chunk, const MetaSource& source, MetaFields& fields);
 bool readID3(const MetaChunk& chunk, const MetaSource& source, MetaFields& fields);
 /// The size and the first bytes of what is for other programs.
 bool readPreview(const MetaChunk& chunk, const MetaSource& source, MetaFields& fields);
 /// "PEAK": the extreme of each channel, with 8 bytes ahead of them.
 bool readPeaks(const MetaChunk& chunk, const MetaSource& source, MetaFields& fields);
+
+/// All of a UMID of 64 bytes, the second half of which may be zeros, and its parts: "umid", "umidLabel" …
+void addUMID(const std::string& name, BytesView umid, MetaFields& fields);
+bool anySet(BytesView bytes);

@@ -16,27 +16,15 @@
 
 namespace {
 
-bool anySet(BytesView bytes)
+/// What the version of a "bext" has no field for: the more, the older it is (EBU Tech 3285).
+void addReserved(BytesView body, unsigned version, MetaFields& fields)
 {
-    return std::ranges::any_of(bytes, [](std::byte byte) { return byte != std::byte{0}; });
-}
-
-/// SMPTE ST 330: a label, a number of the instance and one of the material; of 64 bytes also where and when.
-void addUMID(BytesView umid, MetaFields& fields)
-{
-    constexpr std::size_t basic = 32;
-    const bool isExtended = anySet(umid.subspan(basic));
-    fields.hex("umid", isExtended ? umid : umid.first(basic));
-    fields.hex("umidLabel", umid.first(12));
-    fields.hex("umidInstance", umid.subspan(13, 3));
-    fields.hex("umidMaterial", umid.subspan(16, 16));
-    if (!isExtended)
-        return;
-    fields.hex("umidTime", umid.subspan(32, 8));
-    fields.hex("umidPlace", umid.subspan(40, 12));
-    fields.text("umidCountry", textUpToNUL(umid.subspan(52, 4)));
-    fields.text("umidOrganization", textUpToNUL(umid.subspan(56, 4)));
-    fields.text("umidUser", textUpToNUL(umid.subspan(60, 4)));
+    const std::size_t begin = version == 0   ? offsetof(BroadcastFields, umid)
+                              : version == 1 ? offsetof(BroadcastFields, loudnessValue)
+                                             : offsetof(BroadcastFields, reserved);
+    const BytesView reserved = body.first(sizeof(BroadcastFields)).subspan(begin);
+    if (anySet(reserved))
+        fields.preview("reserved", reserved, reserved.size());
 }
 
 bool readBroadcast(const MetaChunk& chunk, const MetaSource& source, MetaFields& fields)
@@ -52,7 +40,7 @@ bool readBroadcast(const MetaChunk& chunk, const MetaSource& source, MetaFields&
     fields.frames("timeReference", bext->timeReference());
     fields.number("version", std::uint16_t{bext->version});
     if (bext->hasUMID())
-        addUMID(bext->umid, fields);
+        addUMID("umid", bext->umid, fields);
     if (bext->hasLoudness())
         for (const auto& [name, value, unit] : {std::tuple{"loudnessValue", bext->loudnessValue, "LUFS"},
                                                 {"loudnessRange", bext->loudnessRange, "LU"},
@@ -61,8 +49,7 @@ bool readBroadcast(const MetaChunk& chunk, const MetaSource& source, MetaFields&
                                                 {"maxShortTermLoudness", bext->maxShortTermLoudness, "LUFS"}})
             if (value != BroadcastExtension::kNoLoudness)
                 fields.number(name, std::int16_t{value} / 100.0, unit);
-    if (anySet(bext->reserved))
-        fields.preview("reserved", bext->reserved, bext->reserved.size());
+    addReserved(chunk.body, bext->version, fields);
     const auto history = bext->codingHistoryLines();
     for (std::size_t i = 0; i < history.size(); ++i)
         fields.text(fmt::format("codingHistory[{}]", i), history[i]);
@@ -285,14 +272,18 @@ bool readTracks(const MetaChunk& chunk, const MetaSource& source, MetaFields& fi
         return false;
     fields.number("tracks", tracks);
     fields.number("uids", count);
-    for (std::size_t i = 0; i < count && reader.remaining() >= entrySize; ++i) {
-        const std::string item = itemName("uid", i);
+    std::size_t read = 0;
+    while (read < count && reader.remaining() >= entrySize) {
+        const std::string item = itemName("uid", read);
         fields.number(item + "track", reader.read<std::uint16_t>());
         fields.text(item + "uid", textUpToNUL(reader.take(12)));
         fields.text(item + "trackFormat", textUpToNUL(reader.take(14)));
         fields.text(item + "packFormat", textUpToNUL(reader.take(11)));
         reader.skip(1);
+        ++read;
     }
+    fields.missing(count - read);
+    fields.behind(reader.take(reader.remaining()));
     return true;
 }
 
@@ -300,9 +291,11 @@ bool readFact(const MetaChunk& chunk, const MetaSource& source, MetaFields& fiel
 {
     ByteReader reader(chunk.body, source.order);
     const auto frames = reader.read<std::uint32_t>();
-    if (reader.ok())
-        fields.frames("frames", std::uint64_t{frames});
-    return reader.ok();
+    if (!reader.ok())
+        return false;
+    fields.frames("frames", std::uint64_t{frames});
+    fields.behind(reader.take(reader.remaining()));
+    return true;
 }
 
 /// Shown as a digest is written, which is the other way round than it is stored.
@@ -331,8 +324,8 @@ constexpr MetaReader kReaders[] = {
     {fourCC("PEAK"), "peak", readPeaks},
     {fourCC("LGWV"), "lgwv", readPreview},
     {fourCC("MD5 "), "md5", readDigest},
-    {fourCC("UMID"), "umid", readHex},
-    {fourCC("umid"), "umid", readHex},
+    {fourCC("UMID"), "umid", readUMID},
+    {fourCC("umid"), "umid", readUMID},
     {fourCC("_PMX"), "xmp", readText},
     {fourCC("id3 "), "id3", readID3},
     {fourCC("ID3 "), "id3", readID3},

@@ -64,7 +64,7 @@ private:
     std::int64_t fileLength_;
     std::int64_t start_ = 0, size_ = 0;
     ContainerProblem problem_;
-    std::unique_ptr<char[]> bytes_ = std::make_unique<char[]>(kPiece);
+    std::unique_ptr<char[]> bytes_ = std::make_unique_for_overwrite<char[]>(kPiece);
 };
 
 bool areSame(Pieces& a, std::int64_t offsetInA, Pieces& b, std::int64_t offsetInB, std::int64_t size)
@@ -156,7 +156,7 @@ bool ChunkInventory::isInScope(const EditScope& scope, FourCC id, std::int64_t b
 
 ContainerProblem ChunkInventory::takeDigest(Entry& entry) const
 {
-    const auto bytes = std::make_unique<unsigned char[]>(kDigestEnd);
+    const auto bytes = std::make_unique_for_overwrite<unsigned char[]>(kDigestEnd);
     const std::int64_t first = std::min(entry.size, kDigestEnd);
     const std::int64_t last = std::min(entry.size - first, kDigestEnd);
     for (const auto& [offset, count] :

@@ -178,6 +178,13 @@ class Bulk(CommandTest):
         self.imported("path,bext.originator\na.wav,other\n", "--dry-run")
         self.assertEqual((self.folder / "a.wav").read_bytes(), before)
 
+    def test_an_empty_text_is_not_taken_for_the_next(self):
+        self.write("a.wav", wave(chunk(b"LIST", b"INFO" + chunk(b"IART", b"\0") + chunk(b"IART", b"one\0") + chunk(b"IART", b"\0") + chunk(b"IART", b"two\0"))))
+        self.imported("path,info.IART,info.IART[1],info.IART[2]\na.wav,first,two,three\n")
+        self.assertEqual(dict(self.fields("a.wav")["a.wav"]), {"info.IART": "first", "info.IART[1]": "two", "info.IART[2]": "three"})
+        self.run_command("meta", "remove", "a.wav", "info.IART[1]")
+        self.assertIn(b"INFO" + chunk(b"IART", b"\0") + chunk(b"IART", b"first\0") + chunk(b"IART", b"\0") + chunk(b"IART", b"three\0"), (self.folder / "a.wav").read_bytes())
+
     def test_an_empty_cell_says_nothing_unless_it_is_asked(self):
         self.write("a.wav", wave(chunk(b"bext", bext(b"old", version=1)), chunk(b"cue ", struct.pack("<I", 2) + point(5, 48) + point(7, 50)), chunk(b"acid", ACID),
                                  chunk(b"smpl", SAMPLER)))

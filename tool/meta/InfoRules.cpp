@@ -26,6 +26,19 @@ void requireKnown(const MetaEdit& edit, const MetaStep& step, const std::string&
                                  id.size() == sizeof(FourCC) ? " (--lenient writes it)" : "", didYouMean(id, known)));
 }
 
+/// The indices, among the items of the id, of those that `meta` shows: empty texts have no name.
+std::vector<std::size_t> shownItems(const InfoList& list, FourCC id)
+{
+    std::vector<std::size_t> shown;
+    std::size_t index = 0;
+    for (const ListItem& item : list.items()) {
+        if (item.id == id && !textUpToNUL(item.body).empty())
+            shown.push_back(index);
+        index += item.id == id ? 1U : 0U;
+    }
+    return shown;
+}
+
 void setInfo(MetaEdit& edit, const MetaStep& step)
 {
     const MetaName::Part& part = step.name.parts[1];
@@ -37,18 +50,20 @@ void setInfo(MetaEdit& edit, const MetaStep& step)
     const FourCC id = fourCC(text[0], text[1], text[2], text[3]);
     MetaChunk* const chunk = edit.chunkOf(step, kListId, InfoList::kForm);
     auto list = listIn<InfoList>(chunk);
-    const auto count = static_cast<std::size_t>(std::ranges::count(list.items(), id, &ListItem::id));
+    const std::vector<std::size_t> shown = shownItems(list, id);
+    const auto all = static_cast<std::size_t>(std::ranges::count(list.items(), id, &ListItem::id));
     if (step.isRemoval()) {
-        if (const auto index = part.number(); index && list.eraseAt(id, *index)) {
-            if (count > 1)
+        if (const auto index = part.number(); index && *index < shown.size() && list.eraseAt(id, shown[*index])) {
+            if (shown.size() > 1)
                 edit.itemRemoved(step, 1);
             putList(edit, chunk, list);
         }
         return;
     }
-    requireKnown(edit, step, text, count != 0);
-    const bool isFirst = part.index.empty() && count == 0;
-    list.setAt(id, isFirst ? 0 : *edit.itemOf(step, 1, count), step.string());
+    requireKnown(edit, step, text, all != 0);
+    const bool isFirst = part.index.empty() && shown.empty(); // an empty one is filled
+    const std::size_t index = isFirst ? 0 : *edit.itemOf(step, 1, shown.size());
+    list.setAt(id, isFirst ? 0 : index < shown.size() ? shown[index] : all, step.string());
     putList(edit, chunk, list);
 }
 

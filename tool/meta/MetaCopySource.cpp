@@ -14,8 +14,6 @@
 
 namespace {
 
-constexpr FourCC kList = fourCC("LIST"), kCue = fourCC("cue ");
-
 /// What is replaced as a whole: "cue", "smpl.loop"; empty for other fields.
 std::string listOf(const MetaName& name)
 {
@@ -37,7 +35,7 @@ bool isOwnId(const MetaName& name, FourCC container)
     return container == kCaff && (name.group() == "strg" || (name.group() == "mark" && name.rest == "id"));
 }
 
-void sort(std::vector<MetaCell>& cells)
+void sortCells(std::vector<MetaCell>& cells)
 {
     std::vector<MetaName> names;
     std::ranges::transform(cells, std::back_inserter(names), &MetaCell::name);
@@ -62,7 +60,7 @@ std::string scaled(const std::string& text, const SoundChange& change)
     return std::to_string(change.scaled(frames));
 }
 
-void addTo(std::vector<std::string>& names, const std::string& name)
+void addOnce(std::vector<std::string>& names, const std::string& name)
 {
     if (std::ranges::find(names, name) == names.end())
         names.push_back(name);
@@ -90,7 +88,7 @@ MetaCopySource::Content MetaCopySource::contentOf(const HeldMetadata& held, cons
 {
     Content content{cellsOf(held, groups), {}};
     std::erase_if(content.cells, [&](const MetaCell& cell) { return isOwnId(cell.name, held.container); });
-    sort(content.cells);
+    sortCells(content.cells);
     return content;
 }
 
@@ -112,7 +110,7 @@ MetaCopySource::Content MetaCopySource::translated(Family target, bool isLinearP
     for (const MetaChunk& chunk : held_.source.chunks) {
         if (!chunk.isHeld || std::ssize(chunk.body) != chunk.size)
             continue;
-        if (family == Family::wave && chunk.id == kList) {
+        if (family == Family::wave && chunk.id == fourCC("LIST")) {
             lists.emplace_back(chunk.body);
             if (wants("info"))
                 texts.addFromWAVE(chunk.body, held_.source.order);
@@ -128,7 +126,7 @@ MetaCopySource::Content MetaCopySource::translated(Family target, bool isLinearP
         }
     }
     for (const MetaChunk& chunk : held_.source.chunks)
-        if (chunk.id == kCue && chunk.isHeld)
+        if (chunk.id == fourCC("cue ") && chunk.isHeld)
             markers.addFromWAVE(chunk.body, lists, held_.source.order, isLinearPCM);
         else if (chunk.id == fourCC("MARK") && chunk.isHeld)
             markers.addFromAIFF(chunk.body);
@@ -153,7 +151,7 @@ MetaCopySource::Content MetaCopySource::translated(Family target, bool isLinearP
         left.emplace_back("remarks on points and ranges");
     for (const MetaCell& cell : own_.cells)
         if (!known.contains(cell.name.group()))
-            addTo(left, cell.name.group());
+            addOnce(left, cell.name.group());
     Content content = contentOf(made, {});
     content.left = std::move(left);
     return content;
@@ -195,7 +193,7 @@ std::vector<std::vector<MetaStep>> MetaCopySource::stagesFor(const HeldMetadata&
             here[list].emplace(cell.name.text, cell.text);
     for (const MetaCell& cell : cellsOf(held))
         if (const std::string list = listOf(cell.name); !list.empty()) {
-            addTo(items[list], itemOf(cell.name));
+            addOnce(items[list], itemOf(cell.name));
             if (!isOwnId(cell.name, held.container))
                 there[list].emplace(cell.name.text, cell.text);
         }

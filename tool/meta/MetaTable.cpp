@@ -20,7 +20,7 @@
 
 namespace {
 
-constexpr std::size_t kMostBytes = 512 << 20; // of a table, which is held
+constexpr std::size_t kMostOfTable = 512 << 20; // of a table, which is held
 
 // What bwfmetaedit calls the fields of its core document, beside the ids of INFO.
 constexpr std::pair<std::string_view, std::string_view> kCoreNames[] = {
@@ -67,8 +67,8 @@ std::string contentOf(const std::string& file)
         text.resize(size);
         if (got == 0)
             return text;
-        if (size > kMostBytes)
-            throw Failure(fmt::format("is no table: it has more than {} MiB", kMostBytes >> 20));
+        if (size > kMostOfTable)
+            throw Failure(fmt::format("is no table: it has more than {} MiB", kMostOfTable >> 20));
     }
 }
 

@@ -14,7 +14,7 @@ namespace {
 
 constexpr std::string_view kTranslated = "TimeReference (translated)"; // a time, beside the frames
 
-std::string trimmed(const std::string& text)
+std::string withoutBlanks(const std::string& text)
 {
     const std::size_t begin = text.find_first_not_of(' ');
     return begin == std::string::npos ? "" : text.substr(begin, text.find_last_not_of(' ') + 1 - begin);
@@ -25,7 +25,7 @@ std::size_t columnsWith(std::string_view text, char separator)
 {
     try {
         const auto row = CsvReader(text, separator).next();
-        const auto isPath = [](const std::string& cell) { return MetaTableMaker::isPath(trimmed(cell)); };
+        const auto isPath = [](const std::string& cell) { return MetaTableMaker::isPath(withoutBlanks(cell)); };
         return row && std::ranges::any_of(row->cells, isPath) ? row->cells.size() : 0;
     } catch (const Failure&) { // quotation marks end elsewhere with another one
         return 0;
@@ -44,9 +44,9 @@ char separatorOf(std::string_view text)
     return best;
 }
 
-class Reading {
+class CSVTable {
 public:
-    Reading(std::string_view text) : reader_(text, separatorOf(text)) {}
+    CSVTable(std::string_view text) : reader_(text, separatorOf(text)) {}
 
     MetaTable read()
     {
@@ -65,7 +65,7 @@ private:
         std::map<std::size_t, std::size_t> first; // where each column of the table is named
         for (std::size_t i = 0; i < headings_.cells.size(); ++i) {
             std::string& heading = headings_.cells[i];
-            heading = trimmed(heading);
+            heading = withoutBlanks(heading);
             columns_.push_back(kNone);
             if (heading.empty())
                 continue;
@@ -132,5 +132,5 @@ private:
 
 MetaTable metaTableFromCSV(std::string_view text)
 {
-    return Reading(text).read();
+    return CSVTable(text).read();
 }

@@ -9,9 +9,9 @@
 
 namespace {
 
-class Reading : public platform::XMLHandler {
+class XMLTable : public platform::XMLHandler {
 public:
-    explicit Reading(std::string_view text) : stream_(bytesOf(text)), parser_(stream_, *this) {}
+    explicit XMLTable(std::string_view text) : stream_(bytesOf(text)), parser_(stream_, *this) {}
 
     MetaTable read()
     {
@@ -86,5 +86,5 @@ private:
 
 MetaTable metaTableFromXML(std::string_view text)
 {
-    return Reading(text).read();
+    return XMLTable(text).read();
 }

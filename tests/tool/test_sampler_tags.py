@@ -195,6 +195,11 @@ class SamplerTags(CommandTest):
         self.run_command("decode", "d.wav", "-o", "e.wav", "--rate", "22050")
         shown = self.record("tags", "e.wav")
         self.assertEqual((shown["midiRootNote"], [(loop["firstFrame"], loop["lastFrame"]) for loop in shown["loops"]]), (62, [(50, 99)]))
+        # A genre goes with the loop's tags into AIFF, which has no text for it.
+        for name, head, left in (("f.wav", [(b"acid", acid())], "of its texts album is not"), ("g.wav", [], "of its texts genre, album are not")):
+            self.write(name, loop_wave(*head, (b"LIST", b"INFO" + chunk(b"IGNR", b"Blues\0") + chunk(b"IPRD", b"LP\0"))))
+            self.assertIn(left, self.run_command("decode", "--force", name, "-o", "f.aiff").stdout.decode())
+            self.assertEqual(self.record("tags", "f.aiff").get("genre"), "Blues" if head else None)
         self.run_command("decode", "a.aiff", "-o", "part.wav", "--end", "100")
         self.assertEqual(self.of_loop("part.wav"), [None] * 5)
 

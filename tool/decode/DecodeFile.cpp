@@ -137,14 +137,16 @@ DecodeResult decodeFile(const DecodeJob& job, const DecodeOptions& options)
     Target target(job, options.force);
     const DecodedSound& sound = source.sound();
     const DecodeFormat& format = *options.wishes.format;
-    const bool tagsFollow =
-        target.regular() != nullptr && tags.carriesTexts(DecodeFrame(sound, format).container(), source.isWhole());
+    const std::string container = DecodeFrame(sound, format).container();
+    const bool isFile = target.regular() != nullptr;
+    const FollowingTags following{isFile && tags.carriesTexts(container, source.isWhole()),
+                                  isFile && tags.carriesGenre(container, source.isWhole())};
     KeptMetadata kept = DecodeMetadata(job.file).keptIn(format.fileType,
                                                         {source.sourceRate(), sound.sampleRate, source.start(),
                                                          static_cast<std::uint64_t>(sound.frames), source.isWhole()},
-                                                        sound, tagsFollow);
+                                                        sound, following);
     tags.forget(kept.sourceIds);
-    if (kept.hasTexts && !tagsFollow)
+    if (kept.hasTexts && !following.texts)
         tags.forgetTexts();
     const DecodeFrame frame(sound, format, std::move(kept.chunks));
     DecodeResult result{.output = shownName(job.output),

@@ -122,11 +122,11 @@ std::span<const FourCC> DecodeMetadata::chunksOf(Family family)
 /// One output in the making.
 class DecodeMetadata::Keeper {
 public:
-    Keeper(const DecodeMetadata& source, FourCC fileType, const BroadcastChange& changed, bool tagsFollow)
+    Keeper(const DecodeMetadata& source, FourCC fileType, const BroadcastChange& changed, FollowingTags following)
         : source_(source),
           fileType_(fileType),
           changed_(changed),
-          tagsFollow_(tagsFollow),
+          following_(following),
           cues_(changed.change, source.order_, source.isLinearPCM_)
     {
     }
@@ -196,7 +196,7 @@ private:
                 copyCAFInfo(chunk);
             else if (chunk.id == kDigest)
                 copyDigest(chunk);
-            else if (chunk.id == kCAFTexts || chunk.id == kRemark || chunk.id == kComments || !tagsFollow_)
+            else if (chunk.id == kCAFTexts || chunk.id == kRemark || chunk.id == kComments || !following_.texts)
                 keep(chunk.id, chunk);
         }
         if (leavesList)
@@ -242,7 +242,7 @@ private:
     {
         tagging::StringPairs pairs;
         tagging::ForEachCAFInfoString(chunk.body, [&](std::string_view key, std::string_view text) {
-            if (!isOfOneCoding(key) && !(tagsFollow_ && isTagText(key)))
+            if (!isOfOneCoding(key) && !(following_.texts && isTagText(key)))
                 pairs.emplace(key, text);
         });
         told(kCAFInfo);
@@ -261,6 +261,8 @@ private:
             readAIFF(texts, markers);
         else
             readCAF(texts, markers);
+        if (following_.genre && fileType_ == kAIFF) // among its texts there is no place for one
+            std::erase_if(texts.texts, [](const auto& each) { return each.first == "genre"; });
         keepTexts(0, texts);
         dropped_ += markers.move(change());
         std::size_t left = 0;
@@ -301,13 +303,13 @@ private:
             if (chunk.id == kComments)
                 markers.hasMore = comments.addComments(chunk.body) || markers.hasMore;
         for (const HeldChunk& chunk : source_.chunks_) {
-            if (chunk.id == kRemark && tagsFollow_ && !comments.texts.empty())
+            if (chunk.id == kRemark && following_.texts && !comments.texts.empty())
                 continue;
             if (chunk.id == kMark)
                 markers.addFromAIFF(chunk.body);
-            else if (chunk.id == kComments && !tagsFollow_)
+            else if (chunk.id == kComments && !following_.texts)
                 texts.addComments(chunk.body);
-            else if (chunk.id == kRemark || !tagsFollow_)
+            else if (chunk.id == kRemark || !following_.texts)
                 texts.addFromAIFF(chunk.id, chunk.body);
             told(chunk.id);
         }
@@ -323,7 +325,7 @@ private:
                 texts.addFromCAF(chunk.body);
             told(chunk.id);
         }
-        if (tagsFollow_)
+        if (following_.texts)
             std::erase_if(texts.texts, [](const auto& each) { return isTagText(each.first); });
         for (const HeldChunk& chunk : source_.chunks_)
             if (chunk.id == kCAFMarkers)
@@ -358,7 +360,7 @@ private:
     const DecodeMetadata& source_;
     FourCC fileType_;
     BroadcastChange changed_;
-    bool tagsFollow_;
+    FollowingTags following_;
     CueMove cues_;
     std::size_t dropped_ = 0;
     std::vector<HeldChunk> chunks_;
@@ -366,10 +368,10 @@ private:
 };
 
 KeptMetadata DecodeMetadata::keptIn(FourCC fileType, SoundChange change, const DecodedSound& sound,
-                                    bool tagsFollow) const
+                                    FollowingTags following) const
 {
     const bool keepsChannels = channels_ == static_cast<int>(sound.channels);
     const bool keepsCoding = isLinearPCM_ && keepsChannels && change.keepsRate() && bits_ == sound.depth.bits &&
                              isFloat_ == sound.depth.isFloat;
-    return Keeper(*this, fileType, {change, sound, !keepsCoding, keepsChannels}, tagsFollow).run();
+    return Keeper(*this, fileType, {change, sound, !keepsCoding, keepsChannels}, following).run();
 }

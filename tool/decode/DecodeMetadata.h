@@ -18,14 +18,19 @@ struct KeptMetadata {
     std::vector<std::string> notKept; // what of others was left, in words
 };
 
+/// What the loop's tags bring into the output.
+struct FollowingTags {
+    bool texts = false; // title, artist, copyright and comments
+    bool genre = false;
+};
+
 /// Reads the chunks of the source while that may be read; one that has none gives nothing.
 class DecodeMetadata {
 public:
     explicit DecodeMetadata(const std::string& path);
 
-    /// For an output of the type, 0 for bare samples. Where the loop's tags go into the output (`tagsFollow`), they
-    /// bring its title, artist, copyright and comments.
-    KeptMetadata keptIn(FourCC fileType, SoundChange change, const DecodedSound& sound, bool tagsFollow) const;
+    /// For an output of the type, 0 for bare samples.
+    KeptMetadata keptIn(FourCC fileType, SoundChange change, const DecodedSound& sound, FollowingTags following) const;
 
 private:
     enum class Family { none, wave, aiff, caf };

@@ -168,6 +168,13 @@ bool DecodeTags::carriesTexts(const std::string& container, bool isWhole) const
            (container == "AIFF" || container == "CAF");
 }
 
+bool DecodeTags::carriesGenre(const std::string& container, bool isWhole) const
+{
+    return problem_.empty() && source_ != nullptr && source_->tags.isLoop() &&
+           source_->tags.combined.contains(VireoLoopCombinedTagsChunkDataGenreKey) && isWhole &&
+           (container == "AIFF" || container == "CAF");
+}
+
 CarriedTags DecodeTags::carryTo(const std::string& output, const std::string& container, const DecodedSound& sound,
                                 double sourceRate, bool isWhole)
 {

@@ -26,6 +26,8 @@ public:
     void forgetTexts();
     /// Whether carryTo will put the texts about the file (title, artist and so on) into the output.
     bool carriesTexts(const std::string& container, bool isWhole) const;
+    /// The same of the genre, which of a loop is one of its tags.
+    bool carriesGenre(const std::string& container, bool isWhole) const;
 
     /// Puts them into the decoded file, the transients at the frames that they have at another rate; `isWhole` tells
     /// whether all of the sound is there, for what the tags say is true of all of it only. An empty path stands for an

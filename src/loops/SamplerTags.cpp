@@ -9,8 +9,8 @@
 #include "audiofile/metadata/MarkerList.h"
 #include "audiofile/metadata/SamplerChunk.h"
 #include "media/userdata/AudioFileService.h"
+#include "platform/FileText.h"
 #include "platform/String.h"
-#include "platform/TextEncoding.h"
 #include "platform/core/Status.h"
 
 #include <algorithm>
@@ -46,28 +46,13 @@ std::span<const FourCC> idsIn(FourCC fileType)
 {
     if (fileType == fourCC("WAVE") || fileType == fourCC("RIFX") || fileType == fourCC("W64f"))
         return kWaveIDs;
-    if (fileType == fourCC("AIFC"))
-        return kAIFFIDs;
-    if (fileType == fourCC("AIFF")) // whose texts the chunks manager reads
-        return std::span(kAIFFIDs).first(2);
-    return {};
+    return fileType == fourCC("AIFF") || fileType == fourCC("AIFC") ? std::span(kAIFFIDs) : std::span<const FourCC>();
 }
 
-// Many write UTF-8. Who does not, writes Latin-1 into WAVE files, and the encoding of the Macintosh into AIFF files.
 std::string inUTF8(const std::string& bytes, bool isAIFF)
 {
-    if (platform::String::fromUTF8(bytes))
-        return bytes;
-    if (isAIFF)
-        return platform::decodeText(bytes, platform::kTextEncodingWestern).utf8();
-    std::string text;
-    for (const char each : bytes) {
-        const auto byte = static_cast<unsigned char>(each);
-        if (byte >= 0x80)
-            text += static_cast<char>(0xC0 | byte >> 6);
-        text += static_cast<char>(byte < 0x80 ? byte : 0x80 | (byte & 0x3F));
-    }
-    return text;
+    using platform::FallbackEncoding;
+    return platform::decodeFileText(bytes, isAIFF ? FallbackEncoding::macintosh : FallbackEncoding::latin1).utf8;
 }
 
 std::string trimmed(const std::string& text)

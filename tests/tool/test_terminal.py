@@ -66,6 +66,13 @@ class Terminal(CommandTest):
         self.assertTrue(any(line.startswith("lib/") and "….L.wav" not in line and "day.L.wav" in line and "…" in line
                             for line in self.table("info", "lib", columns=50)))
 
+    def test_headings_fit_too(self):
+        for verb in ("tags", "chunks", "meta"):
+            text, _ = self.on_terminal(verb, "lib", columns=56, NO_COLOR="1")
+            headings = [line for line in text.splitlines() if re.search(r"\.(wav|aiff)  ", line)]
+            self.assertEqual((len(headings), [line for line in headings if columns_of(line) > 56]), (12, []), verb)
+            self.assertGreaterEqual(sum("…" in line for line in headings), 4, verb)
+
     def test_the_width_is_what_columns_says_else_the_terminal_else_80(self):
         self.assertEqual(self.table("info", "lib", columns=200, COLUMNS="50"), self.table("info", "lib", columns=50))
         self.assertEqual(self.table("info", "lib", columns=50, COLUMNS="wide"), self.table("info", "lib", columns=50))

@@ -5,6 +5,7 @@
 #include "tool/shared/input/FileByFile.h"
 #include "tool/shared/input/InputFile.h"
 #include "tool/shared/output/Failure.h"
+#include "tool/shared/output/HeadingName.h"
 #include "tool/shared/output/JsonRecords.h"
 #include "tool/shared/output/Table.h"
 
@@ -52,8 +53,8 @@ public:
             json.key("chunks").beginArray();
             list_ = &json;
         } else if (form_ == Form::table) {
-            output_.print("{}{}  {}, {} bytes\n", follows_ ? "\n" : "", printable(path_), fourCCText(extent.id),
-                          extent.end);
+            const std::string rest = fmt::format("  {}, {} bytes", fourCCText(extent.id), extent.end);
+            output_.print("{}{}{}\n", follows_ ? "\n" : "", headingName(path_, rest), rest);
             table_.emplace(std::vector<Table::Column>{{"ID", Align::left, kWidestId},
                                                       {"OFFSET", Align::right, numberWidth()},
                                                       {"SIZE", Align::right, numberWidth()}});

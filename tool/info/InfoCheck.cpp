@@ -7,9 +7,8 @@
 #include "tool/shared/access/FileAccess.h"
 #include "tool/shared/input/FileByFile.h"
 #include "tool/shared/input/InputFile.h"
-#include "tool/shared/output/CsvRecords.h"
+#include "tool/shared/output/DataRecords.h"
 #include "tool/shared/output/DisplayWidth.h"
-#include "tool/shared/output/JsonRecords.h"
 #include "tool/shared/output/Progress.h"
 
 namespace {
@@ -85,14 +84,9 @@ std::vector<Problem> problemsOf(const std::string& path, bool quiet)
     return problemsOfSound(path, quiet);
 }
 
-class CheckWriter {
+class CheckWriter : DataRecords {
 public:
-    explicit CheckWriter(const OutputOptions& options)
-        : form_(outputForm(options)),
-          json_(options),
-          csv_(options, kColumns)
-    {
-    }
+    explicit CheckWriter(const OutputOptions& options) : DataRecords(options, kColumns), form_(outputForm(options)) {}
 
     void add(const std::string& path, const std::vector<Problem>& problems)
     {
@@ -105,16 +99,8 @@ public:
             for (const Problem& problem : problems)
                 addLine(fmt::format("{}: {}{}; {}", printable(path), placeText(problem), problem.text, problem.effect));
     }
-    void addFailure(const std::string& path, const std::string& text)
-    {
-        json_.addFailure(path, text);
-        csv_.addFailure(path, text);
-    }
-    void finish()
-    {
-        json_.finish();
-        csv_.finish();
-    }
+    using DataRecords::addFailure;
+    using DataRecords::finish;
     bool isGood() const { return isGood_; }
 
 private:
@@ -126,7 +112,7 @@ private:
     }
     void addRecord(const std::string& path, const std::vector<Problem>& problems)
     {
-        JsonWriter& json = json_.begin();
+        JsonWriter& json = jsonRecords().begin();
         json.beginObject().member("path", path);
         json.key("findings").beginArray();
         for (const Problem& problem : problems) {
@@ -134,16 +120,16 @@ private:
             json.endObject();
         }
         json.endArray().endObject();
-        json_.end();
+        jsonRecords().end();
     }
     /// One for each finding; of a file in which all is well one that has the path alone.
     void addRows(const std::string& path, const std::vector<Problem>& problems)
     {
         const Record file = Record().member("path", path);
         if (problems.empty())
-            csv_.add(file);
+            csvRecords().add(file);
         for (const Problem& problem : problems)
-            csv_.add(recordOf(problem, file));
+            csvRecords().add(recordOf(problem, file));
     }
     static Record recordOf(const Problem& problem, Record record)
     {
@@ -163,8 +149,6 @@ private:
     Form form_;
     bool isGood_ = true;
     Output& output_ = Output::standard();
-    JsonRecords json_;
-    CsvRecords csv_;
 };
 
 } // namespace

@@ -170,7 +170,9 @@ HeldMetadata holdMetadata(const std::string& path, const MetaGroups& groups)
 
 std::vector<MetaField> fieldsOf(const HeldMetadata& held, const MetaGroups& groups)
 {
-    MetaFields fields(held.sampleRate);
+    using platform::FallbackEncoding;
+    MetaFields fields(held.sampleRate,
+                      held.container == kFORM ? FallbackEncoding::macintosh : FallbackEncoding::latin1);
     for (const MetaChunk& chunk : held.source.chunks)
         readChunk(chunk, held.readers, held.source, groups, fields);
     return fields.take();

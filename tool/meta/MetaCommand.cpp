@@ -6,8 +6,7 @@
 #include "tool/shared/arguments/CommandLine.h"
 #include "tool/shared/arguments/ThreadsOption.h"
 #include "tool/shared/input/FileByFile.h"
-#include "tool/shared/output/CsvRecords.h"
-#include "tool/shared/output/JsonRecords.h"
+#include "tool/shared/output/DataRecords.h"
 
 #include <algorithm>
 #include <utility>
@@ -22,22 +21,19 @@ struct MetaOptions {
 constexpr std::size_t kIdLength = 4;
 
 // Writes what is known of one file after the other.
-class MetaWriter {
+class MetaWriter : DataRecords {
 public:
-    explicit MetaWriter(const OutputOptions& options)
-        : form_(outputForm(options)),
-          json_(options),
-          csv_(options, metaColumns())
+    explicit MetaWriter(const OutputOptions& options) : DataRecords(options, metaColumns()), form_(outputForm(options))
     {
     }
 
     void add(const std::string&, const std::string& text)
     {
         if (form_ == Form::csv) {
-            csv_.addRow(text);
+            csvRecords().addRow(text);
         } else if (form_ == Form::json) {
-            json_.begin().writeJson(text);
-            json_.end();
+            jsonRecords().begin().writeJson(text);
+            jsonRecords().end();
         } else {
             if (form_ == Form::table && !std::exchange(isFirst_, false))
                 output_.write("\n");
@@ -45,24 +41,13 @@ public:
         }
     }
 
-    void addFailure(const std::string& path, const std::string& text)
-    {
-        json_.addFailure(path, text);
-        csv_.addFailure(path, text);
-    }
-
-    void finish()
-    {
-        json_.finish();
-        csv_.finish();
-    }
+    using DataRecords::addFailure;
+    using DataRecords::finish;
 
 private:
     Form form_;
     bool isFirst_ = true;
     Output& output_ = Output::standard();
-    JsonRecords json_;
-    CsvRecords csv_;
 };
 
 std::string lowered(std::string text)

@@ -1,6 +1,5 @@
 #include "tool/meta/MetaFields.h"
 
-#include "tool/shared/output/DisplayWidth.h"
 #include "tool/shared/output/HexText.h"
 
 #include <algorithm>
@@ -11,42 +10,6 @@
 namespace {
 
 constexpr std::size_t kPreviewSize = 32;
-
-bool isASCII(std::string_view text)
-{
-    unsigned char bits = 0;
-    for (const char c : text)
-        bits |= static_cast<unsigned char>(c);
-    return bits < 0x80;
-}
-
-bool isUTF8(std::string_view text)
-{
-    if (isASCII(text)) // most are
-        return true;
-    constexpr char32_t replacement = 0xFFFD; // which may be there itself, in three bytes
-    while (!text.empty()) {
-        const std::size_t before = text.size();
-        if (takeCharacter(text) == replacement && before - text.size() == 1)
-            return false;
-    }
-    return true;
-}
-
-std::string fromLatin1(std::string_view bytes)
-{
-    std::string text;
-    for (const char c : bytes) {
-        const auto byte = static_cast<unsigned char>(c);
-        if (byte < 0x80) {
-            text += c;
-        } else {
-            text += static_cast<char>(0xC0 | byte >> 6);
-            text += static_cast<char>(0x80 | (byte & 0x3F));
-        }
-    }
-    return text;
-}
 
 } // namespace
 
@@ -103,7 +66,7 @@ void MetaFields::enterShared(const MetaChunk& chunk, std::string_view group)
 MetaField& MetaFields::add(std::string_view name, MetaField::Value value)
 {
     MetaField& field = fields_.emplace_back(here_);
-    field.name = isUTF8(name) ? std::string(name) : fromLatin1(name); // keys are texts of the file too
+    field.name = platform::decodeFileText(name, fallback_).utf8; // keys are texts of the file too
     field.value = std::move(value);
     if (const std::uint32_t count = names_.add(fields_, fields_.size() - 1, placeHash_); count != 0)
         appendIndex(field.name, count);
@@ -114,10 +77,10 @@ void MetaFields::text(std::string_view name, std::string_view bytes, std::string
 {
     if (bytes.empty())
         return;
-    const bool isLatin1 = !isUTF8(bytes);
-    MetaField& field = add(name, isLatin1 ? fromLatin1(bytes) : std::string(bytes));
+    platform::FileText text = platform::decodeFileText(bytes, fallback_);
+    MetaField& field = add(name, std::move(text.utf8));
     field.words = words;
-    field.isLatin1 = isLatin1;
+    field.encoding = text.encoding;
 }
 
 void MetaFields::frames(std::string_view name, std::uint64_t frames)

@@ -1,6 +1,7 @@
 // What a file says about itself, as a list of fields with stable names, each told where it stands.
 #pragma once
 
+#include "platform/FileText.h"
 #include "platform/core/Bytes.h"
 #include "platform/core/FourCC.h"
 
@@ -25,13 +26,13 @@ struct MetaChunk {
 struct MetaField {
     using Value = std::variant<std::string, std::int64_t, std::uint64_t, double>;
 
-    std::string group;             // "bext": what the option --only asks for
-    std::string place;             // "bext", of a second chunk "bext[1]"
-    std::string name;              // within the place: "description"; empty where the chunk is the field
-    Value value;                   // texts in UTF-8
-    std::string words;             // what the value or its id stands for: "Artist", "LUFS"
-    std::optional<double> seconds; // what a number of frames takes
-    bool isLatin1 = false;         // a text that is not UTF-8
+    std::string group;              // "bext": what the option --only asks for
+    std::string place;              // "bext", of a second chunk "bext[1]"
+    std::string name;               // within the place: "description"; empty where the chunk is the field
+    Value value;                    // texts in UTF-8
+    std::string words;              // what the value or its id stands for: "Artist", "LUFS"
+    std::optional<double> seconds;  // what a number of frames takes
+    const char* encoding = nullptr; // of a text that is not UTF-8, its IANA name
     std::optional<std::uint64_t>
         byteSize; // of bytes: `value` is the hexadecimal of the first, `ascii` the same as text
     std::string ascii;
@@ -76,15 +77,21 @@ private:
 /// Collects fields, and gives those of the same name different ones: "info.IART", "info.IART[1]".
 class MetaFields {
 public:
-    /// The rate tells the time of numbers of frames; 0 where it is not known.
-    explicit MetaFields(double sampleRate) : sampleRate_(sampleRate) { fields_.reserve(kUsualFields); }
+    /// The rate tells the time of numbers of frames; 0 where it is not known. Texts that are not UTF-8 are in
+    /// `fallback`.
+    explicit MetaFields(double sampleRate, platform::FallbackEncoding fallback = platform::FallbackEncoding::latin1)
+        : sampleRate_(sampleRate),
+          fallback_(fallback)
+    {
+        fields_.reserve(kUsualFields);
+    }
 
     /// From now on fields are of this chunk.
     void enter(const MetaChunk& chunk, std::string_view group);
     /// The same, of a chunk that says more of what others tell under the group.
     void enterShared(const MetaChunk& chunk, std::string_view group);
 
-    /// Nothing for an empty text. Bytes that are not UTF-8 are taken for Latin-1.
+    /// Nothing for an empty text.
     void text(std::string_view name, std::string_view bytes, std::string_view words = "");
     template <class Number>
         requires std::integral<Number> || std::floating_point<Number>
@@ -117,6 +124,7 @@ private:
     MetaField& add(std::string_view name, MetaField::Value value);
 
     double sampleRate_;
+    platform::FallbackEncoding fallback_;
     MetaField here_; // the parts that fields share
     std::size_t placeHash_ = 0;
     std::map<std::string, std::size_t> places_;

@@ -2,13 +2,12 @@
 
 #include "tool/shared/output/ClockTime.h"
 #include "tool/shared/output/DisplayWidth.h"
+#include "tool/shared/output/HeadingName.h"
 #include "tool/shared/output/JsonWriter.h"
 
 #include <algorithm>
 
 namespace {
-
-constexpr const char* kLatin1 = "ISO-8859-1";
 
 std::string valueText(const MetaField& field)
 {
@@ -52,8 +51,8 @@ void tell(const MetaField& field, const std::string& name, Sink& sink)
     tellValue(field, sink);
     sink.knownMember("words", field.words).knownMember("seconds", field.seconds);
     sink.knownMember("size", field.byteSize).knownMember("ascii", field.ascii);
-    if (field.isLatin1)
-        sink.member("encoding", kLatin1);
+    if (field.encoding != nullptr)
+        sink.member("encoding", field.encoding);
 }
 
 /// Where it stands.
@@ -170,8 +169,8 @@ std::string MetaText::tree(const std::string& path, const FileMetadata& metadata
     constexpr int widest = 40;
     const char* const bold = color_ ? "\x1b[1m" : "";
     const char* const plain = color_ ? "\x1b[0m" : "";
-    std::string text = fmt::format("{}{}{}{}\n", bold, printable(path), plain,
-                                   metadata.container != 0 ? "  " + fourCCText(metadata.container) : "");
+    const std::string rest = metadata.container != 0 ? "  " + fourCCText(metadata.container) : "";
+    std::string text = fmt::format("{}{}{}{}\n", bold, headingName(path, rest), plain, rest);
     for (auto field = metadata.fields.begin(); field != metadata.fields.end();) {
         const auto isOfPlace = [&first = *field](const MetaField& other) {
             return other.place == first.place && other.offset == first.offset;
@@ -186,7 +185,8 @@ std::string MetaText::tree(const std::string& path, const FileMetadata& metadata
         for (; field != end; ++field) {
             const std::string head = label(*field);
             text += fmt::format("    {}{:{}}{}{}{}\n", head, "", std::max(width - displayWidth(head), 0),
-                                width == 0 ? "" : "  ", readable(*field), field->isLatin1 ? " [Latin-1]" : "");
+                                width == 0 ? "" : "  ", readable(*field),
+                                field->encoding != nullptr ? fmt::format(" [{}]", field->encoding) : "");
         }
     }
     if (metadata.fields.empty())

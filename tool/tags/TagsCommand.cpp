@@ -6,32 +6,32 @@
 #include "tool/shared/input/FileByFile.h"
 #include "tool/shared/looptags/LoopTags.h"
 #include "tool/shared/looptags/LoopTagsCsv.h"
+#include "tool/shared/output/DataRecords.h"
 #include "tool/shared/output/DisplayWidth.h"
 #include "tool/shared/output/Failure.h"
-#include "tool/shared/output/JsonRecords.h"
+#include "tool/shared/output/HeadingName.h"
 
 namespace {
 
 // Writes the tags of one file after the other, each as soon as they are read.
-class TagsWriter {
+class TagsWriter : DataRecords {
 public:
     /// With `several` files each line says which.
     TagsWriter(const OutputOptions& options, bool several)
-        : form_(outputForm(options)),
+        : DataRecords(options, loopColumns()),
+          form_(outputForm(options)),
           color_(usesColor(options.color)),
-          several_(several),
-          json_(options),
-          csv_(options, loopColumns())
+          several_(several)
     {
     }
 
     void add(const std::string& path, const LoopTags& tags)
     {
         if (form_ == Form::json) {
-            writeLoopTags(json_.begin(), path, tags);
-            json_.end();
+            writeLoopTags(jsonRecords().begin(), path, tags);
+            jsonRecords().end();
         } else if (form_ == Form::csv) {
-            csv_.addRow(loopRow(path, tags));
+            csvRecords().addRow(loopRow(path, tags));
         } else if (form_ == Form::table) {
             addTable(path, tags);
         } else if (form_ == Form::lines) {
@@ -42,24 +42,16 @@ public:
         first_ = false;
     }
 
-    void addFailure(const std::string& path, const std::string& text)
-    {
-        json_.addFailure(path, text);
-        csv_.addFailure(path, text);
-    }
-
-    void finish()
-    {
-        json_.finish();
-        csv_.finish();
-    }
+    using DataRecords::addFailure;
+    using DataRecords::finish;
 
 private:
     void addTable(const std::string& path, const LoopTags& tags)
     {
         constexpr int kLabelWidth = 12, kIndent = kLabelWidth + 4;
-        output_.print("{}{}{}{}  {}\n", first_ ? "" : "\n", color_ ? "\x1b[1m" : "", printable(path),
-                      color_ ? "\x1b[0m" : "", loopContainerName(tags.fileType));
+        const std::string rest = fmt::format("  {}", loopContainerName(tags.fileType));
+        output_.print("{}{}{}{}{}\n", first_ ? "" : "\n", color_ ? "\x1b[1m" : "", headingName(path, rest),
+                      color_ ? "\x1b[0m" : "", rest);
         const auto lines = tagLines(tags);
         for (const TagLine& line : lines) {
             const bool isTempo = line.name == std::string_view("tempo");
@@ -78,8 +70,6 @@ private:
     bool first_ = true;
     std::optional<int> columns_ = columnsOfOutput();
     Output& output_ = Output::standard();
-    JsonRecords json_;
-    CsvRecords csv_;
 };
 
 bool runTags(const FileArguments& files, unsigned threads, const OutputOptions& options)

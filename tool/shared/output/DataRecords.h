@@ -24,6 +24,10 @@ public:
         json.endObject();
         json_.end();
     }
+    // For records that are more than members, or several rows:
+    JsonRecords& jsonRecords() { return json_; }
+    CsvRecords& csvRecords() { return csv_; }
+
     void addFailure(const std::string& path, const std::string& text)
     {
         csv_.addFailure(path, text);

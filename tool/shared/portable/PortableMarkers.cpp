@@ -6,11 +6,15 @@
 #include "audiofile/metadata/CueList.h"
 #include "audiofile/metadata/MarkerList.h"
 #include "media/containers/ContainerHeaders.h"
+#include "platform/FileText.h"
 
 #include <algorithm>
 #include <limits>
 #include <unordered_map>
 #include <unordered_set>
+
+using platform::decodeFileText;
+using platform::FallbackEncoding;
 
 namespace {
 
@@ -108,7 +112,7 @@ void PortableMarkers::addFromWAVE(BytesView body, const std::vector<BytesView>& 
         const auto name = names.find(id), note = notes.find(id);
         hasMore = hasMore || (name != names.end() && note != notes.end());
         const std::string text = name != names.end() ? name->second : note != notes.end() ? note->second : "";
-        markers.push_back({id, frameOf(point, isLinearPCM), textInUTF8(text, false)});
+        markers.push_back({id, frameOf(point, isLinearPCM), decodeFileText(text, FallbackEncoding::latin1).utf8});
     }
 }
 
@@ -116,7 +120,8 @@ void PortableMarkers::addFromAIFF(BytesView body)
 {
     if (const auto list = MarkerList::read(body))
         for (const AIFFMarker& marker : list->markers)
-            markers.push_back({static_cast<std::uint32_t>(marker.id), marker.position, textInUTF8(marker.name, true)});
+            markers.push_back({static_cast<std::uint32_t>(marker.id), marker.position,
+                               decodeFileText(marker.name, FallbackEncoding::macintosh).utf8});
 }
 
 void PortableMarkers::addFromCAF(BytesView body, BytesView texts)
@@ -131,7 +136,7 @@ void PortableMarkers::addFromCAF(BytesView body, BytesView texts)
             continue;
         const std::uint32_t id = marker.id;
         markers.push_back({id, static_cast<std::uint64_t>(std::round(frame)),
-                           textInUTF8(names ? names->find(id).value_or("") : "", false)});
+                           decodeFileText(names ? names->find(id).value_or("") : "", FallbackEncoding::latin1).utf8});
         hasMore = hasMore || FourCC{marker.type} != 0 || std::uint32_t{marker.channel} != 0;
     }
 }

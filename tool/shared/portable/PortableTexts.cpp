@@ -5,10 +5,13 @@
 #include "files/AudioFileTypes.h"
 #include "loops/tagging/CAFPayloads.h"
 #include "media/containers/ContainerHeaders.h"
-#include "platform/TextEncoding.h"
+#include "platform/FileText.h"
 
 #include <algorithm>
 #include <array>
+
+using platform::decodeFileText;
+using platform::FallbackEncoding;
 
 namespace {
 
@@ -53,23 +56,6 @@ bool isOfOneCoding(std::string_view infoKey)
     return std::ranges::find(keys, infoKey) != keys.end();
 }
 
-std::string textInUTF8(std::string_view bytes, bool isMacRoman)
-{
-    if (!platform::decodeText(bytes, platform::kTextEncodingUTF8).isNull())
-        return std::string(bytes);
-    if (isMacRoman)
-        return platform::decodeText(bytes, platform::kTextEncodingWestern).utf8();
-    std::string text;
-    for (const char c : bytes) { // Latin-1
-        const auto byte = static_cast<unsigned char>(c);
-        if (byte < 0x80)
-            text += c;
-        else
-            (text += static_cast<char>(0xC0 | byte >> 6)) += static_cast<char>(0x80 | (byte & 0x3F));
-    }
-    return text;
-}
-
 void PortableTexts::add(std::string_view key, std::string text)
 {
     const auto found = std::ranges::find(texts, key, [](const auto& each) { return std::string_view(each.first); });
@@ -87,7 +73,7 @@ void PortableTexts::addFromWAVE(BytesView list, std::endian order)
     for (const ListItem& item : info->items()) {
         const TextRow* const row = rowOf(&TextRow::info, item.id);
         if (row != nullptr)
-            add(row->key, textInUTF8(textUpToNUL(item.body), false));
+            add(row->key, decodeFileText(textUpToNUL(item.body), FallbackEncoding::latin1).utf8);
         else
             others.push_back(fourCCText(item.id));
     }
@@ -96,7 +82,7 @@ void PortableTexts::addFromWAVE(BytesView list, std::endian order)
 void PortableTexts::addFromAIFF(FourCC id, BytesView body)
 {
     if (const TextRow* const row = id != 0 ? rowOf(&TextRow::aiff, id) : nullptr; row != nullptr)
-        add(row->key, textInUTF8(upToNUL(textOf(body)), true));
+        add(row->key, decodeFileText(upToNUL(textOf(body)), FallbackEncoding::macintosh).utf8);
 }
 
 bool PortableTexts::addComments(BytesView comments)
@@ -106,7 +92,7 @@ bool PortableTexts::addComments(BytesView comments)
         return false;
     for (const AIFFComment& comment : list->comments)
         if (comment.marker == 0)
-            add("comments", textInUTF8(comment.text, true));
+            add("comments", decodeFileText(comment.text, FallbackEncoding::macintosh).utf8);
     return std::ranges::any_of(list->comments, [](const AIFFComment& comment) { return comment.marker != 0; });
 }
 
@@ -114,7 +100,7 @@ void PortableTexts::addFromCAF(BytesView info)
 {
     tagging::ForEachCAFInfoString(info, [this](std::string_view key, std::string_view text) {
         if (const TextRow* const row = rowOfKey(key); row != nullptr)
-            add(key, std::string(text));
+            add(key, decodeFileText(text, FallbackEncoding::latin1).utf8);
         else if (!isOfOneCoding(key))
             others.emplace_back(key);
     });

@@ -38,6 +38,3 @@ private:
 
 /// Whether CAF's "info" has the key for what is true of one file only, such as its bit rate.
 bool isOfOneCoding(std::string_view infoKey);
-
-/// In UTF-8: bytes that are that already stay, others are taken for the 8-bit encoding of their kind of file.
-std::string textInUTF8(std::string_view bytes, bool isMacRoman);

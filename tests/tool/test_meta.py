@@ -149,6 +149,11 @@ class Meta(CommandTest):
         if (LIBRARY.parent / "ktfiles/libktfiles-tags.so").exists():
             self.assertEqual((items["id3.TIT2"]["value"], items["id3.TPE1"]["value"], items["id3.TPE1"]["words"]), ("Ein Täst", "me", "ARTIST"))
             self.assertEqual(items["id3.TIT2"]["chunk"], "ID3 ")
+            picture = b"\0image/png\0\3\0\x89PNG" + bytes(20 << 20)  # larger than any text is read
+            frames = b"".join(name + struct.pack(">IH", len(body), 0) + body for name, body in ((b"TIT2", b"\3Title"), (b"APIC", picture)))
+            self.write("b.wav", wave(chunk(b"id3 ", b"ID3\3\0\0" + bytes(len(frames) >> shift & 127 for shift in (21, 14, 7, 0)) + frames)))
+            items = {item["field"]: item for item in self.record("meta", "b.wav")["fields"]}
+            self.assertEqual((items["id3.TIT2"]["value"], items["id3.APIC"]["size"]), ("Title", 4 + (20 << 20)))
         bare, = json.loads(self.run_command("meta", "--json", "a.aiff", "--only", "id3", env=self.without_decoders()).stdout)
         item, = bare["fields"]
         self.assertEqual((item["ascii"][:3], item["chunk"]), ("ID3", "ID3 "))

@@ -11,9 +11,10 @@
 
 namespace {
 
-constexpr std::int64_t kMostBytes = 16 << 20; // of all chunks that are held whole
-constexpr std::int64_t kMostOfList = 2 << 20; // of one of numbers, of which fields are fifty times as large
-constexpr std::int64_t kHead = 64;            // of the others
+constexpr std::int64_t kMostBytes = 64 << 20;  // of all chunks that are held whole: an ID3 tag has large pictures
+constexpr std::int64_t kMostOfText = 16 << 20; // of one
+constexpr std::int64_t kMostOfList = 2 << 20;  // of one of numbers, of which fields are fifty times as large
+constexpr std::int64_t kHead = 64;             // of the others
 
 // What `info` and `chunks` tell of: coding, samples, room that is not used.
 constexpr std::array kStructure{fourCC("fmt "), fourCC("data"), fourCC("ds64"), fourCC("COMM"), fourCC("SSND"),
@@ -81,9 +82,10 @@ std::int64_t mostOf(const MetaReader& reader)
 {
     if (reader.read == readPreview)
         return 0;
-    const bool isText =
-        reader.read == readText || reader.read == readIXML || reader.read == readADM || reader.read == readID3;
-    return isText ? kMostBytes : kMostOfList;
+    if (reader.read == readID3)
+        return kMostBytes;
+    const bool isText = reader.read == readText || reader.read == readIXML || reader.read == readADM;
+    return isText ? kMostOfText : kMostOfList;
 }
 
 /// The chunks that may be metadata, in the order of the file; with `extent` of the container.

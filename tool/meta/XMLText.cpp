@@ -167,6 +167,7 @@ void XMLText::setAttribute(const XMLElement& element, std::string_view name, std
     const auto found = std::ranges::find(element.attributes, name, &XMLElement::Attribute::name);
     std::string text = escaped(value, true);
     if (found == element.attributes.end()) {
+        requireWritable(name);
         const std::size_t at = element.begin + 1 + element.name.size();
         return change(at, at, fmt::format(" {}=\"{}\"", name, text));
     }
@@ -176,8 +177,16 @@ void XMLText::setAttribute(const XMLElement& element, std::string_view name, std
     change(found->begin, found->end, text);
 }
 
+/// Names are looked for as they are typed, in UTF-8, and so they are not found in other encodings.
+void XMLText::requireWritable(std::string_view name) const
+{
+    if (!takesUTF8_ && std::ranges::any_of(name, [](char c) { return static_cast<unsigned char>(c) >= 0x80; }))
+        throw Failure("its XML is not in UTF-8, and takes ASCII names only");
+}
+
 void XMLText::addChild(const XMLElement& parent, std::string_view name)
 {
+    requireWritable(name);
     const std::string child = fmt::format("<{0}></{0}>", name);
     if (parent.isOneTag()) {
         const std::size_t slash = text_.rfind('/', parent.end - 1);

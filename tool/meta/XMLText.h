@@ -46,6 +46,7 @@ public:
     void removeAttribute(const XMLElement& element, std::string_view name);
 
 private:
+    void requireWritable(std::string_view name) const;
     void change(std::size_t begin, std::size_t end, std::string_view by);
     void scan();
     std::string escaped(std::string_view value, bool isAttribute) const;

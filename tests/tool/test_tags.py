@@ -60,8 +60,9 @@ class Show(TagsTest):
         descriptors = (b"Dry", b"Acoustic")
         aiff_with(self.folder / "a.aiff", (b"basc", BASIC), (b"cate", category(b"Drums", b"Kick", b"Rock", descriptors)),
                   (b"trns", bytes(72) + struct.pack(">I", 9) + struct.pack(">HHI16x", 1, 0, 77)),  # of 9, one is there
-                  (b"CHST", b"strip"), (b"NAME", b"Ten"), (b"AUTH", b"\xFF"))
+                  (b"CHST", b"strip"), (b"NAME", b"Ten"), (b"AUTH", b"J\x9Frgen"))
         shown = self.tags("a.aiff")
+        self.assertEqual(shown.pop("artist"), "Jürgen")  # Mac Roman
         seconds = self.json("info", "a.aiff")[0]["durationSeconds"]
         self.assertAlmostEqual(shown.pop("tempo"), 8 * 60 / seconds)
         shown.pop("comments")  # by the program that made the file
@@ -69,7 +70,7 @@ class Show(TagsTest):
         self.assertEqual({chunk: {key for key, value in sources.items() if value == chunk} for chunk in sources.values()},
                          {"basc": {"tempo", "beatCount", "midiRootNote", "keyType", "signatureTop", "signatureBottom", "loopFileType"},
                           "cate": {"instrumentType", "instrumentSubType", "genre", "descriptors"}, "NAME": {"title"}, "COMT": {"comments"},
-                          "trns": {"transients"}})
+                          "AUTH": {"artist"}, "trns": {"transients"}})
         self.assertEqual(shown, {
             "path": "a.aiff", "fileType": "AIFF", "containerName": "AIFF", "sampleRate": 44100, "frames": 4410, "durationSeconds": 0.1,
             "beatCount": 8, "midiRootNote": 57, "key": "A", "keyType": 1, "mode": "minor", "signatureTop": 6,

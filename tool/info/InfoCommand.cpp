@@ -323,6 +323,6 @@ void declareInfo(CommandLine& commandLine)
         .excludes(sha256);
 }
 
-const VerbRegistration registration{10, declareInfo};
+const VerbRegistration registration{10, "info", declareInfo};
 
 } // namespace

@@ -89,6 +89,6 @@ void declarePair(CommandLine& commandLine)
     commandLine.addCsv(verb);
 }
 
-const VerbRegistration registration{15, declarePair};
+const VerbRegistration registration{15, "pair", declarePair};
 
 } // namespace

@@ -193,6 +193,6 @@ void declareProject(CommandLine& commandLine)
     declareEdits(commandLine, verb, arguments);
 }
 
-const VerbRegistration registration{65, declareProject};
+const VerbRegistration registration{65, "project", declareProject};
 
 } // namespace

@@ -63,9 +63,14 @@ std::string secondsProblem(const std::string& argument)
     return secondsFromText(argument) ? "" : "\"" + printable(argument) + "\" is no number of seconds, 0 or more";
 }
 
-std::multimap<int, void (*)(CommandLine&)>& registeredVerbs()
+struct RegisteredVerb {
+    std::string_view name;
+    void (*declare)(CommandLine&);
+};
+
+std::multimap<int, RegisteredVerb>& registeredVerbs()
 {
-    static std::multimap<int, void (*)(CommandLine&)> verbs;
+    static std::multimap<int, RegisteredVerb> verbs; // by rank
     return verbs;
 }
 
@@ -99,8 +104,6 @@ CommandLine::CommandLine()
     : program_("ktfiles", "Describes audio files, and lists and edits the chunks of their containers.", KTFILES_VERSION)
 {
     program_.setFooter("Exit status: 0, 1 when a file failed, 2 for a mistake on the command line.");
-    VerbRegistration::declareAll(*this);
-    addHelpVerb();
 }
 
 Verb& CommandLine::addVerb(const std::string& name, const std::string& description, Verb::Work run, Verb* parent)
@@ -204,8 +207,9 @@ void CommandLine::addEditOptions(Verb& verb, EditOptions& options)
     verb.addFlag("--keep-times", options.keepTimes, "Keep the time of the last modification");
 }
 
-void CommandLine::addHelpVerb()
+void CommandLine::declareVerbs(const std::vector<std::string>& arguments)
 {
+    VerbRegistration::declareNamed(*this, arguments.empty() ? "" : arguments.front());
     program_.addVerb("help", "Print the help of a verb", [this] { return printHelp(); })
         .addTexts("VERB", helpTopics_, "The verb, and what it works on");
 }
@@ -231,6 +235,7 @@ bool CommandLine::printHelp() const
 
 int CommandLine::parseAndRun(const std::vector<std::string>& arguments)
 {
+    declareVerbs(arguments);
     try {
         if (!arguments.empty() && !arguments.front().starts_with('-') && program_.find(arguments.front()) == nullptr)
             throw unknownVerb(arguments.front());
@@ -267,13 +272,17 @@ int CommandLine::run(int argc, char** argv)
     return status;
 }
 
-VerbRegistration::VerbRegistration(int rank, void (*declare)(CommandLine&))
+VerbRegistration::VerbRegistration(int rank, const char* name, void (*declare)(CommandLine&))
 {
-    registeredVerbs().emplace(rank, declare);
+    registeredVerbs().emplace(rank, RegisteredVerb{name, declare});
 }
 
-void VerbRegistration::declareAll(CommandLine& commandLine)
+void VerbRegistration::declareNamed(CommandLine& commandLine, std::string_view name)
 {
-    for (const auto& [rank, declare] : registeredVerbs())
-        declare(commandLine);
+    const auto& verbs = registeredVerbs();
+    const auto isMeant = [name](const auto& verb) { return verb.second.name == name; };
+    const bool isKnown = std::any_of(verbs.begin(), verbs.end(), isMeant);
+    for (const auto& verb : verbs)
+        if (!isKnown || isMeant(verb))
+            verb.second.declare(commandLine);
 }

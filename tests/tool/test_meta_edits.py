@@ -322,6 +322,15 @@ class MetaEdits(CommandTest):
         media = json.loads(output("mediainfo", "--Output=JSON", "a.wav"))["media"]["track"][0]
         self.assertEqual((media["Producer"], media["Title"]), ("somebody", "A title"), media)
 
+    def test_changes_fit_a_terminal_and_are_never_none(self):
+        self.write("a.wav", wave(chunk(b"bext", bext(b"old")), chunk(b"iXML", b"<A><U/><U>b</U></A>")))
+        text, status = self.on_terminal("meta", "set", "a.wav", "bext.description=" + "long " * 40, "info.ICMT=x", columns=60)
+        self.assertEqual((status, text.splitlines()[0], text.splitlines()[2]), (0, "a.wav: set 2 fields", "  info.ICMT=x"))
+        self.assertLessEqual(max(map(len, text.splitlines())), 60)
+        self.assertRegex(text, r"\n  bext\.description=lo.*….*\(was old\)\n")
+        self.assertEqual(self.on_terminal("meta", "set", "a.wav", "info.ICMT=y", columns=60)[0], "a.wav: set info.ICMT=y (was x)\n")
+        self.assertEqual(self.lines("meta", "remove", "a.wav", "ixml.U[0]"), ['a.wav: removed what no field shows, in "iXML"'])
+
     def test_files_and_fields_are_told_apart(self):
         for name in ("info.wav", "bext=1.wav"):
             self.write(name, wave(chunk(b"LIST", INFO)))

@@ -1,5 +1,6 @@
 #include "tool/meta/MetaEdits.h"
 
+#include "tool/shared/output/DisplayWidth.h"
 #include "tool/shared/output/ShownName.h"
 #include "tool/shared/output/Terminal.h"
 
@@ -12,16 +13,21 @@ std::string inWords(const MetaField::Value& value)
     return std::visit([](const auto& each) { return fmt::format("{}", each); }, value);
 }
 
-std::string inWords(const std::vector<MetaChange>& changes)
+std::string inWords(const MetaChange& change)
+{
+    return change.field + (change.to ? "=" + inWords(*change.to) : "") +
+           (change.from ? " (was " + inWords(*change.from) + ")" : "");
+}
+
+/// An empty element, say, goes without a field of it.
+std::string inWords(const MetaPlan& plan)
 {
     std::string text;
-    for (const MetaChange& change : changes) {
-        text += (text.empty() ? "" : ", ") + change.field;
-        if (change.to)
-            text += "=" + inWords(*change.to);
-        if (change.from)
-            text += " (was " + inWords(*change.from) + ")";
-    }
+    for (const MetaChange& change : plan.changes)
+        text += (text.empty() ? "" : ", ") + inWords(change);
+    if (text.empty())
+        for (const FourCC id : plan.ids)
+            text += fmt::format("{} \"{}\"", text.empty() ? "what no field shows, in" : ",", fourCCText(id));
     return text;
 }
 
@@ -111,12 +117,19 @@ void MetaEdits::tell(const std::string& path, const MetaPlan& plan, const std::s
         json.member("dryRun", options_.dryRun).knownMember("backup", backup).endObject();
         json_.end();
     } else if (!output_.quiet) {
-        const std::string what =
-            plan.items.empty()
-                ? "unchanged"
-                : fmt::format("{} {}", options_.dryRun ? words_.dryRun : words_.done, inWords(plan.changes));
-        Output::standard().print(
-            "{}\n", printable(fmt::format("{}: {}{}{}{}", path, what, inWords(plan.unmeasured) + inWords(plan.left),
-                                          backup.empty() ? "" : "; backup ", backup)));
+        const char* const done = options_.dryRun ? words_.dryRun : words_.done;
+        const auto line = [&](const std::string& what) {
+            return printable(fmt::format("{}: {}{}{}{}", path, what, inWords(plan.unmeasured) + inWords(plan.left),
+                                         backup.empty() ? "" : "; backup ", backup));
+        };
+        const std::string all = line(plan.items.empty() ? "unchanged" : fmt::format("{} {}", done, inWords(plan)));
+        const auto columns = columnsOfOutput();
+        if (!columns || plan.changes.empty() || displayWidth(all) <= *columns)
+            return Output::standard().print("{}\n", all);
+        // On a terminal a line for each field where one does not hold them all.
+        const std::size_t count = plan.changes.size();
+        Output::standard().print("{}\n", line(fmt::format("{} {} {}", done, count, count == 1 ? "field" : "fields")));
+        for (const MetaChange& change : plan.changes)
+            Output::standard().print("  {}\n", shortened(printable(inWords(change)), *columns - 2));
     }
 }

@@ -2,6 +2,7 @@
 import csv
 import io
 import json
+import os
 import random
 import re
 import struct
@@ -181,12 +182,25 @@ class Meta(CommandTest):
 
     def test_tags_of_files_without_chunks(self):
         """As ffprobe reads them, under the keys of each system."""
-        titles = {"mp3": "id3v2.TIT2", "flac": "vorbis.TITLE", "ogg": "vorbis.TITLE", "m4a": "mp4.\xa9nam", "wma": "asf.Title", "wv": "ape.title"}
+        tags = ["-metadata", "title=Gänge", "-metadata", "track=3/9"]
+        titles = {"mp3": "id3v2.TIT2", "flac": "vorbis.TITLE", "ogg": "vorbis.TITLE", "opus": "vorbis.TITLE", "m4a": "mp4.\xa9nam",
+                  "wma": "asf.Title", "wv": "ape.title", "aac": "id3v2.TIT2", "mpc": "ape.Title", "dsf": "id3v2.TIT2"}
         for kind, field in titles.items():
             with self.subTest(kind=kind):
                 name = f"a.{kind}"
-                subprocess.run(["ffmpeg", "-nostdin", "-loglevel", "error", "-f", "lavfi", "-i", "sine=d=0.2", "-metadata", "title=Gänge",
-                                "-metadata", "track=3/9", name], cwd=self.folder, check=True)
+                if kind == "mpc":
+                    self.encoded("mpc.wav", seconds=0.2)
+                    subprocess.run(["mpcenc", "--silent", "--tag", "Title=Gänge", "--tag", "Track=3/9", "mpc.wav", name], cwd=self.folder, check=True,
+                                   capture_output=True, env={**os.environ, "LC_ALL": "C.UTF-8"})
+                elif kind == "dsf":  # the tag of the MP3 behind the samples
+                    tag = (self.folder / "a.mp3").read_bytes()[:4096]
+                    size = 10 + sum((byte & 127) << shift for byte, shift in zip(tag[6:10], (21, 14, 7, 0)))
+                    fmt = b"fmt " + struct.pack("<QIIIIIIQII", 52, 1, 0, 1, 1, 2822400, 1, 32768, 4096, 0)
+                    sound = b"data" + struct.pack("<Q", 12 + 4096) + bytes(4096)
+                    end = 28 + len(fmt) + len(sound)
+                    self.write(name, b"DSD " + struct.pack("<QQQ", 28, end + size, end) + fmt + sound + tag[:size])
+                else:
+                    self.encoded(name, *tags, *(["-write_id3v2", "1"] if kind == "aac" else []), seconds=0.2)
                 fields = self.fields(name)
                 self.assertEqual(fields[field], "Gänge")
                 self.assertIn("3/9", fields.values())

@@ -174,6 +174,12 @@ class Bulk(CommandTest):
         for name in "bcd":
             self.assertEqual((self.folder / (name + ".wav")).read_bytes(), content)
         self.assertIn(b"A=1\n\nA=3\r\nA=4\r\n", (self.folder / "e.wav").read_bytes())
+        # Line ends that a spreadsheet changed are no change, and a text that is changed keeps its own.
+        lines = wave(chunk(b"LIST", b"INFO" + chunk(b"ICMT", b"one\r\ntwo\0")))
+        self.write("f.wav", lines)
+        self.assertEqual(self.imported('path,info.ICMT\nf.wav,"one\ntwo"\n')[0]["f.wav"]["changes"], [])
+        self.imported('path,info.ICMT\nf.wav,"one\n2"\n')
+        self.assertIn(b"one\r\n2\0", (self.folder / "f.wav").read_bytes())
         before = (self.folder / "a.wav").read_bytes()
         self.imported("path,bext.originator\na.wav,other\n", "--dry-run")
         self.assertEqual((self.folder / "a.wav").read_bytes(), before)
@@ -299,7 +305,8 @@ class Bulk(CommandTest):
         for name in names:
             self.write(name, old)
         self.write("t.csv", "path,bext.description\n".encode() + "".join(f"{name},new\n" for name in names).encode())
-        with subprocess.Popen([KTFILES, "meta", "import", "t.csv"], cwd=self.folder, stdout=subprocess.PIPE, stderr=subprocess.PIPE, text=True) as process:
+        with subprocess.Popen([KTFILES, "meta", "import", "t.csv"], cwd=self.folder, stdout=subprocess.PIPE, stderr=subprocess.PIPE, text=True,
+                              preexec_fn=lambda: signal.signal(signal.SIGINT, signal.SIG_DFL)) as process:  # which a background job ignores
             told = [process.stdout.readline() for _ in range(10)]
             process.send_signal(signal.SIGINT)
             rest, error = process.communicate(timeout=30)

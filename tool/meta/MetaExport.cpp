@@ -118,7 +118,7 @@ void declareMetaExport(CommandLine& commandLine, Verb& meta)
     const Argument csv = verb.addFlag("--csv", arguments.csv, "Write comma-separated values; unless -o names .xml");
     verb.addFlag("--xml", arguments.xml, "Write XML").excludes(csv);
     verb.addFlag("--bom", arguments.isMarked, "Begin CSV with a mark by which spreadsheets know UTF-8");
-    CommandLine::addPath(verb, "-o,--output", arguments.out, "The file to write; else standard output");
+    CommandLine::addPath(verb, "-o,--output", arguments.out, "The file to write; else standard output").label("OUT");
     CommandLine::addForceOption(verb, arguments.existing);
     verb.addText("--only", arguments.only, "Only these, behind commas: bext, ixml, info, cue, smpl, …").label("GROUPS");
     addThreads(verb, arguments.threads);

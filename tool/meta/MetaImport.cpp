@@ -45,6 +45,7 @@ void checkValues(MetaTable& table, const ImportArguments& arguments)
                     {row.line,
                      fmt::format("{}{}", column.heading == column.field.text ? "" : column.heading + ": ", why)});
         }
+    std::ranges::stable_sort(table.problems, {}, &TableProblem::line);
 }
 
 bool tellProblems(const MetaTable& table, const std::string& name, const OutputOptions& output)

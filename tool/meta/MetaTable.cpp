@@ -184,6 +184,5 @@ MetaTable MetaTableMaker::finish()
         if (first != row.line)
             addProblem(row.line, fmt::format("{} is in line {} already", row.path, first));
     }
-    std::ranges::stable_sort(table_.problems, {}, &TableProblem::line);
     return std::move(table_);
 }

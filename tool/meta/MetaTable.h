@@ -18,9 +18,9 @@ struct MetaRow {
     std::vector<Cell> cells; // in the order of columns
 };
 
-/// What is wrong with a table, by the line.
+/// What is wrong with a table.
 struct TableProblem {
-    std::size_t line = 0; // 0: the whole
+    std::size_t line = 0;
     std::string text;
 };
 

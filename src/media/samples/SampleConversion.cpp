@@ -1,6 +1,7 @@
 #include "media/samples/SampleConversion.h"
 
-#include "media/samples/SampleConversionAVX2.h"
+#include "media/samples/SampleKinds.h"
+#include "media/samples/SampleRoads.h"
 #include "platform/core/Packed.h"
 
 #include <algorithm>
@@ -67,57 +68,58 @@ std::int32_t rounded(float sample)
     return static_cast<std::int32_t>(std::min<long>(std::lrint(scaled), highest));
 }
 
-// Each step converts one sample between a format of `size` bytes and a float.
-template <int Bytes, std::endian Order, Byte Flip = 0>
-struct IntegerStep {
+template <bool isBig>
+constexpr std::endian kOrder = isBig ? std::endian::big : std::endian::little;
+
+// Each kind converts one sample between a format of `size` bytes and a float.
+template <int Bytes, bool isBig, bool isUnsigned>
+struct Integers {
     static constexpr std::size_t size = Bytes;
+    static constexpr Byte flip = isUnsigned ? 0x80 : 0; // unsigned bytes only
     static float read(const Byte* from)
     {
-        const Byte flipped = static_cast<Byte>(*from ^ Flip); // unsigned bytes only
-        return static_cast<float>(loadInteger<Bytes, Order>(Flip != 0 ? &flipped : from)) / kFullScale<Bytes>;
+        const Byte flipped = static_cast<Byte>(*from ^ flip);
+        return static_cast<float>(loadInteger<Bytes, kOrder<isBig>>(isUnsigned ? &flipped : from)) / kFullScale<Bytes>;
     }
     static void write(Byte* to, float sample)
     {
-        storeInteger<Bytes, Order>(to, rounded<Bytes>(sample));
-        *to = static_cast<Byte>(*to ^ Flip);
+        storeInteger<Bytes, kOrder<isBig>>(to, rounded<Bytes>(sample));
+        *to = static_cast<Byte>(*to ^ flip);
     }
 };
 
-template <class Float, std::endian Order>
-struct FloatStep {
+template <class Float, bool isBig>
+struct FloatsOf {
     static constexpr std::size_t size = sizeof(Float);
-    static float read(const Byte* from) { return static_cast<float>(load<Float>(from, Order)); }
-    static void write(Byte* to, float sample) { store(to, static_cast<Float>(sample), Order); }
+    static float read(const Byte* from) { return static_cast<float>(load<Float>(from, kOrder<isBig>)); }
+    static void write(Byte* to, float sample) { store(to, static_cast<Float>(sample), kOrder<isBig>); }
 };
 
-// Calls `use` with the step of the format; the one place that knows them all.
-template <std::endian Order, class Use>
-void withStep(SampleFormat format, Use use)
-{
-    if (format.isFloat)
-        return format.bits == 64 ? use(FloatStep<double, Order>()) : use(FloatStep<float, Order>());
-    switch (format.bits) {
-    case 8:
-        return format.isUnsigned ? use(IntegerStep<1, Order, 0x80>()) : use(IntegerStep<1, Order>());
-    case 16:
-        return use(IntegerStep<2, Order>());
-    case 24:
-        return use(IntegerStep<3, Order>());
-    default:
-        return use(IntegerStep<4, Order>());
+template <bool isBig>
+using Floats = FloatsOf<float, isBig>;
+
+template <bool isBig>
+using Doubles = FloatsOf<double, isBig>;
+
+template <class Kind>
+struct Reader {
+    static void run(const void* samples, float* to, std::size_t count)
+    {
+        const auto* from = static_cast<const Byte*>(samples);
+        for (std::size_t i = 0; i < count; ++i)
+            to[i] = Kind::read(from + i * Kind::size);
     }
-}
+};
 
-template <class Use>
-void withStep(SampleFormat format, Use use)
-{
-    if (format.order == std::endian::little)
-        withStep<std::endian::little>(format, use);
-    else
-        withStep<std::endian::big>(format, use);
-}
-
-const bool fastRoad = hasAVX2();
+template <class Kind>
+struct Writer {
+    static void run(const float* from, void* samples, std::size_t count)
+    {
+        auto* to = static_cast<Byte*>(samples);
+        for (std::size_t i = 0; i < count; ++i)
+            Kind::write(to + i * Kind::size, from[i]);
+    }
+};
 
 template <class T>
 void swapEach(Byte* at, std::size_t count)
@@ -130,20 +132,12 @@ void swapEach(Byte* at, std::size_t count)
 
 void samplesToFloatPlain(const void* samples, SampleFormat format, float* to, std::size_t count)
 {
-    const auto* from = static_cast<const Byte*>(samples);
-    withStep(format, [=](auto step) {
-        for (std::size_t i = 0; i < count; ++i)
-            to[i] = step.read(from + i * step.size);
-    });
+    roadOf<Reader, Integers, Floats, Doubles>(format)(samples, to, count);
 }
 
 void floatToSamplesPlain(const float* from, SampleFormat format, void* samples, std::size_t count)
 {
-    auto* to = static_cast<Byte*>(samples);
-    withStep(format, [=](auto step) {
-        for (std::size_t i = 0; i < count; ++i)
-            step.write(to + i * step.size, from[i]);
-    });
+    roadOf<Writer, Integers, Floats, Doubles>(format)(from, samples, count);
 }
 
 void swapSamples(void* samples, int bytesPerSample, std::size_t count)
@@ -167,14 +161,14 @@ void swapSamples(void* samples, int bytesPerSample, std::size_t count)
 
 void samplesToFloat(const void* samples, SampleFormat format, float* to, std::size_t count)
 {
-    const std::size_t done = fastRoad ? samplesToFloatAVX2(samples, format, to, count) : 0;
+    const std::size_t done = hasFastRoads() ? samplesToFloatFast(samples, format, to, count) : 0;
     const std::size_t offset = done * static_cast<std::size_t>(format.bytesPerSample());
     samplesToFloatPlain(static_cast<const Byte*>(samples) + offset, format, to + done, count - done);
 }
 
 void floatToSamples(const float* from, SampleFormat format, void* samples, std::size_t count)
 {
-    const std::size_t done = fastRoad ? floatToSamplesAVX2(from, format, samples, count) : 0;
+    const std::size_t done = hasFastRoads() ? floatToSamplesFast(from, format, samples, count) : 0;
     const std::size_t offset = done * static_cast<std::size_t>(format.bytesPerSample());
     floatToSamplesPlain(from + done, format, static_cast<Byte*>(samples) + offset, count - done);
 }

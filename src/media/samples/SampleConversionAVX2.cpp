@@ -1,29 +1,30 @@
-#include "media/samples/SampleConversionAVX2.h"
-
-#if defined(__x86_64__)
-
 #include "media/samples/SampleLanesAVX2.h"
+
+#if defined(KT_AVX2)
+
+#include "media/samples/SampleKinds.h"
+#include "media/samples/SampleRoads.h"
+#include "media/samples/SampleVectorRoads.h"
 
 namespace platform {
 namespace {
 
 using namespace avx2;
-constexpr std::size_t kStep = 8; // samples in a vector of floats
 
-KT_AVX2 inline void store16(Byte* to, __m128i value)
+KT_VECTORS inline void store16(Byte* to, __m128i value)
 {
     _mm_storeu_si128(reinterpret_cast<__m128i*>(to), value);
 }
 
 // Eight samples, left-aligned or not: `kScale` brings them to [-1, 1).
-template <int Bytes, bool Big, bool Unsigned = false>
+template <int Bytes, bool Big, bool Unsigned>
 struct Integers {
     static constexpr std::size_t size = Bytes;
     // 24 bits stand in the upper bytes of their lanes, where converting them is exact.
     static constexpr int laneBits = Bytes == 3 ? 32 : 8 * Bytes;
     static constexpr float scale = 1.0F / static_cast<float>(std::uint32_t{1} << (laneBits - 1));
 
-    KT_AVX2 static inline __m256i lanes(const Byte* from)
+    KT_VECTORS static inline __m256i lanes(const Byte* from)
     {
         if constexpr (Bytes == 1) {
             const __m128i bytes = _mm_loadl_epi64(reinterpret_cast<const __m128i*>(from));
@@ -39,13 +40,13 @@ struct Integers {
         }
     }
 
-    KT_AVX2 static inline void read(const Byte* from, float* to)
+    KT_VECTORS static inline void read(const Byte* from, float* to)
     {
         _mm256_storeu_ps(to, _mm256_mul_ps(_mm256_cvtepi32_ps(lanes(from)), _mm256_set1_ps(scale)));
     }
 
     // Rounds half to even, clamps, makes NaN 0: eight integers.
-    KT_AVX2 static inline __m256i rounded(const float* from)
+    KT_VECTORS static inline __m256i rounded(const float* from)
     {
         constexpr float full = static_cast<float>(std::uint32_t{1} << (8 * Bytes - 1));
         const __m256 samples = _mm256_mul_ps(_mm256_loadu_ps(from), _mm256_set1_ps(full));
@@ -59,7 +60,7 @@ struct Integers {
         return _mm256_xor_si256(_mm256_cvtps_epi32(above), _mm256_castps_si256(tooLarge));
     }
 
-    KT_AVX2 static inline void write(Byte* to, const float* from)
+    KT_VECTORS static inline void write(Byte* to, const float* from)
     {
         const __m256i values = rounded(from);
         if constexpr (Bytes == 4) {
@@ -89,13 +90,13 @@ template <bool Big>
 struct Floats {
     static constexpr std::size_t size = 4;
 
-    KT_AVX2 static inline void read(const Byte* from, float* to)
+    KT_VECTORS static inline void read(const Byte* from, float* to)
     {
         const __m256i words = _mm256_loadu_si256(reinterpret_cast<const __m256i*>(from));
         _mm256_storeu_si256(reinterpret_cast<__m256i*>(to), Big ? swap4(words) : words);
     }
 
-    KT_AVX2 static inline void write(Byte* to, const float* from)
+    KT_VECTORS static inline void write(Byte* to, const float* from)
     {
         const __m256i words = _mm256_loadu_si256(reinterpret_cast<const __m256i*>(from));
         _mm256_storeu_si256(reinterpret_cast<__m256i*>(to), Big ? swap4(words) : words);
@@ -106,7 +107,7 @@ template <bool Big>
 struct Doubles {
     static constexpr std::size_t size = 8;
 
-    KT_AVX2 static inline void read(const Byte* from, float* to)
+    KT_VECTORS static inline void read(const Byte* from, float* to)
     {
         for (std::size_t half = 0; half < 2; ++half) {
             const __m256i words = _mm256_loadu_si256(reinterpret_cast<const __m256i*>(from + 32 * half));
@@ -114,7 +115,7 @@ struct Doubles {
         }
     }
 
-    KT_AVX2 static inline void write(Byte* to, const float* from)
+    KT_VECTORS static inline void write(Byte* to, const float* from)
     {
         for (std::size_t half = 0; half < 2; ++half) {
             const __m256i words = _mm256_castpd_si256(_mm256_cvtps_pd(_mm_loadu_ps(from + 4 * half)));
@@ -123,92 +124,16 @@ struct Doubles {
     }
 };
 
-template <class Format>
-struct Reader {
-    KT_AVX2 static std::size_t run(const void* samples, float* to, std::size_t count)
-    {
-        const auto* from = static_cast<const Byte*>(samples);
-        const std::size_t whole = count / kStep * kStep;
-        for (std::size_t i = 0; i < whole; i += kStep)
-            Format::read(from + i * Format::size, to + i);
-        return whole;
-    }
-};
-
-template <class Format>
-struct Writer {
-    KT_AVX2 static std::size_t run(const float* from, void* samples, std::size_t count)
-    {
-        auto* to = static_cast<Byte*>(samples);
-        const std::size_t whole = count / kStep * kStep;
-        for (std::size_t i = 0; i < whole; i += kStep)
-            Format::write(to + i * Format::size, from + i);
-        return whole;
-    }
-};
-
-template <template <class> class Road, bool Big, class From, class To>
-std::size_t dispatch(SampleFormat format, From from, To to, std::size_t count)
-{
-    if (format.isFloat)
-        return format.bits == 64 ? Road<Doubles<Big>>::run(from, to, count) : Road<Floats<Big>>::run(from, to, count);
-    switch (format.bits) {
-    case 8:
-        return format.isUnsigned ? Road<Integers<1, Big, true>>::run(from, to, count)
-                                 : Road<Integers<1, Big>>::run(from, to, count);
-    case 16:
-        return Road<Integers<2, Big>>::run(from, to, count);
-    case 24:
-        return Road<Integers<3, Big>>::run(from, to, count);
-    default:
-        return Road<Integers<4, Big>>::run(from, to, count);
-    }
-}
-
-template <template <class> class Road, class From, class To>
-std::size_t dispatch(SampleFormat format, From from, To to, std::size_t count)
-{
-    return format.order == std::endian::big ? dispatch<Road, true>(format, from, to, count)
-                                            : dispatch<Road, false>(format, from, to, count);
-}
-
 } // namespace
 
-bool hasAVX2()
+std::size_t samplesToFloatFast(const void* samples, SampleFormat format, float* to, std::size_t count)
 {
-    __builtin_cpu_init(); // may run ahead of the constructor that does it
-    return __builtin_cpu_supports("avx2") != 0;
+    return roadOf<VectorReader, Integers, Floats, Doubles>(format)(samples, to, count);
 }
 
-std::size_t samplesToFloatAVX2(const void* samples, SampleFormat format, float* to, std::size_t count)
+std::size_t floatToSamplesFast(const float* from, SampleFormat format, void* samples, std::size_t count)
 {
-    return dispatch<Reader>(format, samples, to, count);
-}
-
-std::size_t floatToSamplesAVX2(const float* from, SampleFormat format, void* samples, std::size_t count)
-{
-    return dispatch<Writer>(format, from, samples, count);
-}
-
-} // namespace platform
-
-#else
-
-namespace platform {
-
-bool hasAVX2()
-{
-    return false;
-}
-
-std::size_t samplesToFloatAVX2(const void*, SampleFormat, float*, std::size_t)
-{
-    return 0;
-}
-
-std::size_t floatToSamplesAVX2(const float*, SampleFormat, void*, std::size_t)
-{
-    return 0;
+    return roadOf<VectorWriter, Integers, Floats, Doubles>(format)(from, samples, count);
 }
 
 } // namespace platform

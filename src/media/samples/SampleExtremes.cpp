@@ -1,15 +1,12 @@
 #include "media/samples/SampleExtremes.h"
 
-#include "media/samples/SampleConversionAVX2.h"
-#include "media/samples/SampleExtremesAVX2.h"
+#include "media/samples/SampleRoads.h"
 
 #include <algorithm>
 #include <array>
 
 namespace platform {
 namespace {
-
-const bool fastRoad = hasAVX2();
 
 // Comparisons that a NaN fails, so that it counts as nothing.
 void fold(const float* samples, std::size_t count, SampleExtremes& extremes)
@@ -44,8 +41,8 @@ void sampleExtremesPlain(const void* samples, SampleFormat format, std::size_t s
 void sampleExtremes(const void* samples, SampleFormat format, std::size_t samplesPerRun, std::size_t runs,
                     SampleExtremes* to)
 {
-    if (fastRoad)
-        sampleExtremesAVX2(samples, format, samplesPerRun, runs, to);
+    if (hasFastRoads())
+        sampleExtremesFast(samples, format, samplesPerRun, runs, to);
     else
         sampleExtremesPlain(samples, format, samplesPerRun, runs, to);
 }

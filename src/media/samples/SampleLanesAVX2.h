@@ -1,46 +1,45 @@
-// Samples brought into the lanes of vectors: what the fast roads over samples have in common. For their .cpp files
-// only.
+// Samples brought into the lanes of vectors: what the fast roads by AVX2 have in common. For their .cpp files only.
 #pragma once
 
-#if defined(__x86_64__)
+#include "media/samples/SampleVectors.h"
 
+#if defined(KT_AVX2)
+
+#include <cstddef>
 #include <immintrin.h>
-
-// Only the functions marked so are compiled for AVX2; the library runs everywhere.
-#define KT_AVX2 __attribute__((target("avx2")))
 
 namespace platform::avx2 {
 
 using Byte = unsigned char;
 
-KT_AVX2 inline __m128i load16(const Byte* from)
+KT_VECTORS inline __m128i load16(const Byte* from)
 {
     return _mm_loadu_si128(reinterpret_cast<const __m128i*>(from));
 }
 
-KT_AVX2 inline __m256i load32(const Byte* from)
+KT_VECTORS inline __m256i load32(const Byte* from)
 {
     return _mm256_loadu_si256(reinterpret_cast<const __m256i*>(from));
 }
 
-KT_AVX2 inline __m128i swap2(__m128i value)
+KT_VECTORS inline __m128i swap2(__m128i value)
 {
     return _mm_shuffle_epi8(value, _mm_setr_epi8(1, 0, 3, 2, 5, 4, 7, 6, 9, 8, 11, 10, 13, 12, 15, 14));
 }
 
-KT_AVX2 inline __m256i swap2(__m256i value)
+KT_VECTORS inline __m256i swap2(__m256i value)
 {
     return _mm256_shuffle_epi8(
         value, _mm256_broadcastsi128_si256(_mm_setr_epi8(1, 0, 3, 2, 5, 4, 7, 6, 9, 8, 11, 10, 13, 12, 15, 14)));
 }
 
-KT_AVX2 inline __m256i swap4(__m256i value)
+KT_VECTORS inline __m256i swap4(__m256i value)
 {
     return _mm256_shuffle_epi8(
         value, _mm256_broadcastsi128_si256(_mm_setr_epi8(3, 2, 1, 0, 7, 6, 5, 4, 11, 10, 9, 8, 15, 14, 13, 12)));
 }
 
-KT_AVX2 inline __m256i swap8(__m256i value)
+KT_VECTORS inline __m256i swap8(__m256i value)
 {
     return _mm256_shuffle_epi8(
         value, _mm256_broadcastsi128_si256(_mm_setr_epi8(7, 6, 5, 4, 3, 2, 1, 0, 15, 14, 13, 12, 11, 10, 9, 8)));
@@ -48,7 +47,7 @@ KT_AVX2 inline __m256i swap8(__m256i value)
 
 /// Eight samples of 3 bytes, each in the upper bytes of a lane of 4.
 template <bool Big>
-KT_AVX2 inline __m256i load24(const Byte* from)
+KT_VECTORS inline __m256i load24(const Byte* from)
 {
     // Two overlapping loads take the 24 bytes and none beyond.
     const __m256i bytes = _mm256_setr_m128i(load16(from), load16(from + 8));

@@ -1,0 +1,50 @@
+#include "media/samples/SampleRoads.h"
+
+#include "media/samples/SampleVectors.h"
+
+namespace platform {
+
+#if defined(KT_AVX2)
+
+bool hasFastRoads()
+{
+    static const bool hasAVX2 = [] {
+        __builtin_cpu_init(); // may run ahead of the constructor that does it
+        return __builtin_cpu_supports("avx2") != 0;
+    }();
+    return hasAVX2;
+}
+
+#elif defined(KT_NEON)
+
+bool hasFastRoads()
+{
+    return true; // every processor of this architecture
+}
+
+#else
+
+bool hasFastRoads()
+{
+    return false;
+}
+
+std::size_t samplesToFloatFast(const void*, SampleFormat, float*, std::size_t)
+{
+    return 0;
+}
+
+std::size_t floatToSamplesFast(const float*, SampleFormat, void*, std::size_t)
+{
+    return 0;
+}
+
+void sampleExtremesFast(const void* samples, SampleFormat format, std::size_t samplesPerRun, std::size_t runs,
+                        SampleExtremes* to)
+{
+    sampleExtremesPlain(samples, format, samplesPerRun, runs, to);
+}
+
+#endif
+
+} // namespace platform

@@ -37,10 +37,9 @@ StreamDescription newDataFormat(int channels, int bits, long sampleRate, FourCC 
 }
 
 template <class T>
-void reverseUnlessWAVE(FourCC fileType, T& value)
+void turn(FourCC fileType, T& value)
 {
-    if (fileType != kWAVE)
-        value = byteSwapped(value);
+    value = inByteOrder(value, fileType == kWAVE ? std::endian::little : std::endian::big);
 }
 
 } // namespace
@@ -229,20 +228,20 @@ bool CAuFileIO::IsVireoLoop()
 
 void CAuFileIO::ByteOrder(int& value) const
 {
-    reverseUnlessWAVE(fileType_, value);
+    turn(fileType_, value);
 }
 
 void CAuFileIO::ByteOrder(short& value) const
 {
-    reverseUnlessWAVE(fileType_, value);
+    turn(fileType_, value);
 }
 
 void CAuFileIO::ByteOrder(unsigned int& value) const
 {
-    reverseUnlessWAVE(fileType_, value);
+    turn(fileType_, value);
 }
 
 void CAuFileIO::ByteOrder(unsigned short& value) const
 {
-    reverseUnlessWAVE(fileType_, value);
+    turn(fileType_, value);
 }

@@ -72,7 +72,7 @@ public:
     std::int32_t RemoveChunk(long id);
     bool IsVireoLoop();
 
-    /// Reverse the bytes of the value unless the file type is "WAVE".
+    /// The value between little-endian, when the file type is "WAVE", else big-endian, and host order; either way.
     void ByteOrder(int& value) const;
     void ByteOrder(short& value) const;
     void ByteOrder(unsigned int& value) const;

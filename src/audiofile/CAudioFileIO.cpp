@@ -243,14 +243,14 @@ std::int32_t CAudioFileIO::SetNumFrames(long frames)
 
 void CAudioFileIO::ByteOrder(int* value) const
 {
-    if (info_.fileType != kWAVE && value != nullptr)
-        *value = byteSwapped(*value);
+    if (value != nullptr)
+        *value = inByteOrder(*value, info_.fileType == kWAVE ? std::endian::little : std::endian::big);
 }
 
 void CAudioFileIO::ByteOrder(unsigned int* value) const
 {
-    if (info_.fileType != kWAVE && value != nullptr)
-        *value = byteSwapped(*value);
+    if (value != nullptr)
+        *value = inByteOrder(*value, info_.fileType == kWAVE ? std::endian::little : std::endian::big);
 }
 
 bool CAudioFileIO::IsSupportedFileType(const platform::String& contentTypeIdentifier)

@@ -144,7 +144,7 @@ public:
     std::unique_ptr<KTMem> CreateOverview();
     std::unique_ptr<KTMem> CreateOverview(const OverviewProgress& progress, std::int32_t* status = nullptr);
 
-    /// Reverses the bytes of a value unless the open file is "WAVE".
+    /// A value between little-endian, when the open file is "WAVE", else big-endian, and host order; either way.
     void ByteOrder(int* value) const;
     void ByteOrder(unsigned int* value) const;
 

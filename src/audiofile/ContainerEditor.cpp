@@ -2,6 +2,7 @@
 
 #include "audiofile/FileWindow.h"
 #include "media/containers/ChunkWalk.h"
+#include "platform/core/ByteOrder.h"
 
 #include <algorithm>
 #include <array>
@@ -49,8 +50,7 @@ std::int32_t ContainerEditor::appendToCAF(FourCC id, BytesView body)
     if (const std::int32_t status = file_.GetEOF(&end); status != kStatusOK)
         return status;
     CAFChunkHeader header{id, static_cast<std::int64_t>(body.size())};
-    header.id.swap();
-    header.size.swap();
+    turnFields(std::endian::big, header.id, header.size);
     const BytesView pieces[] = {std::as_bytes(std::span(&header, 1)), body};
     return writeTogether(end, pieces) == kStatusOK ? kAdded : kChunkHeaderFailed;
 }
@@ -325,6 +325,6 @@ std::int32_t ContainerEditor::renameToFree(std::int64_t position, const Containe
             return writeChunkHeader(position, chunk, header);
         }
     }
-    chunk.id.swap();
+    turnFields(std::endian::big, chunk.id);
     return file_.Write(&chunk.id, position, sizeof chunk.id);
 }

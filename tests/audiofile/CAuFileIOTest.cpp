@@ -310,7 +310,7 @@ TEST(CAuFileIO, AFileThatCannotBeCreatedChangesNothing)
     EXPECT_EQ(file.NumFrames(), 0); // nothing is left of the file before
 }
 
-TEST(CAuFileIO, ByteOrderIsReversedUnlessTheFileIsWAVE)
+TEST(CAuFileIO, ByteOrderTurnsLittleEndianOfWAVEElseBig)
 {
     const TemporaryFolder folder;
     for (const int container : {int{SF_FORMAT_WAV}, int{SF_FORMAT_AIFF}, 0}) {
@@ -324,10 +324,10 @@ TEST(CAuFileIO, ByteOrderIsReversedUnlessTheFileIsWAVE)
         short little = 0x0102;
         unsigned short least = 0x0102;
         file.ByteOrder(number), file.ByteOrder(natural), file.ByteOrder(little), file.ByteOrder(least);
-        const bool isKept = container == SF_FORMAT_WAV;
-        EXPECT_EQ(number, isKept ? 0x01020304 : 0x04030201);
-        EXPECT_EQ(natural, isKept ? 0x01020304U : 0x04030201U);
-        EXPECT_EQ(little, isKept ? 0x0102 : 0x0201);
-        EXPECT_EQ(least, isKept ? 0x0102 : 0x0201);
+        const auto order = container == SF_FORMAT_WAV ? std::endian::little : std::endian::big;
+        EXPECT_EQ(number, inByteOrder(0x01020304, order));
+        EXPECT_EQ(natural, inByteOrder(0x01020304U, order));
+        EXPECT_EQ(little, inByteOrder<short>(0x0102, order));
+        EXPECT_EQ(least, inByteOrder<unsigned short>(0x0102, order));
     }
 }

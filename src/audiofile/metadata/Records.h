@@ -2,29 +2,13 @@
 // file; its `byteOrder` turns those that are numbers from the order of the file to the host's, or back.
 #pragma once
 
+#include "platform/core/ByteOrder.h"
 #include "platform/core/ByteReader.h"
 #include "platform/core/ByteWriter.h"
 
 #include <algorithm>
 #include <optional>
 #include <vector>
-
-template <class T>
-void turnField(Packed<T>& field)
-{
-    if constexpr (std::is_floating_point_v<T>)
-        field = load<T>(&field, std::endian::native == std::endian::big ? std::endian::little : std::endian::big);
-    else
-        field.swap();
-}
-
-/// Turns each number when `order` is not the host's.
-template <class... Fields>
-void turnFields(std::endian order, Fields&... fields)
-{
-    if (order != std::endian::native)
-        (turnField(fields), ...);
-}
 
 /// The record that stands next, in host order; none when fewer bytes are left, of which it then takes none.
 template <class Record>

@@ -1,17 +1,14 @@
 #include "loops/tagging/Chunks.h"
 
-#include <bit>
+#include "platform/core/ByteOrder.h"
 
 namespace tagging {
 namespace {
 
-constexpr bool kSwaps = std::endian::native == std::endian::little;
-
 template <class... Fields>
 void swapAll(Fields&... fields)
 {
-    if constexpr (kSwaps)
-        (fields.swap(), ...);
+    turnFields(std::endian::big, fields...);
 }
 
 template <class T, std::size_t N>

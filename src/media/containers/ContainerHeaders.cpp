@@ -1,9 +1,8 @@
 #include "media/containers/ContainerHeaders.h"
 
-#include <algorithm>
+#include "platform/core/ByteOrder.h"
 
-// Ids are swapped and the sizes of "WAVE" stay as they are: that is host order on little-endian hosts.
-static_assert(std::endian::native == std::endian::little);
+#include <algorithm>
 
 namespace {
 
@@ -31,6 +30,12 @@ bool isWAVEInAnyOrder(FourCC formType)
     return formType == kWAVE || formType == byteSwapped(kWAVE);
 }
 
+/// Of the sizes. Ids are big-endian everywhere.
+std::endian orderOf(FourCC formType)
+{
+    return isWAVEInAnyOrder(formType) ? std::endian::little : std::endian::big;
+}
+
 /// How many of the entries held lie within the body of a first chunk of that size.
 std::size_t entriesWithin(std::uint32_t firstChunkSize)
 {
@@ -54,10 +59,8 @@ void ContainerChk::SetSize(long long newSize)
 
 void ContainerChk::ByteOrder()
 {
-    if (!isWAVEInAnyOrder(formType))
-        size.swap();
-    id.swap();
-    formType.swap();
+    turnFields(orderOf(formType), size);
+    turnFields(std::endian::big, id, formType);
 }
 
 bool ContainerChkExtended::HasValidDs64() const
@@ -109,16 +112,17 @@ void ContainerChkExtended::ByteOrder()
 {
     const bool wasInHostOrder = formType == kWAVE;
     const bool hadDs64 = HasValidDs64();
-    if (!isWAVEInAnyOrder(formType)) {
-        size.swap();
-        firstChunkSize.swap();
-    }
-    id.swap();
-    formType.swap();
-    firstChunkId.swap();
+    const std::endian order = orderOf(formType);
+    turnFields(order, size, firstChunkSize);
+    turnFields(std::endian::big, id, formType, firstChunkId);
     if (wasInHostOrder ? hadDs64 : HasValidDs64()) {
         for (std::size_t i = 0; i < entriesWithin(firstChunkSize); ++i)
-            table[i].id.swap();
+            turnFields(std::endian::big, table[i].id);
+    }
+    if (order == std::endian::little) { // "ds64" or what may become one; other containers have none
+        turnFields(order, riffSize, dataSize, sampleCount, tableLength);
+        for (Ds64TableEntry& entry : table)
+            turnFields(order, entry.size);
     }
 }
 
@@ -163,7 +167,6 @@ std::int32_t ChkHeader::SetSize(long long newSize, ContainerChkExtended& header)
 
 void ChkHeader::ByteOrder(const ContainerChkExtended& header)
 {
-    id.swap();
-    if (!header.IsWAVE())
-        size.swap();
+    turnFields(std::endian::big, id);
+    turnFields(orderOf(header.formType), size);
 }

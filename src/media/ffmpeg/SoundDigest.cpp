@@ -1,5 +1,7 @@
 #include "media/ffmpeg/SoundDigest.h"
 
+#include "platform/core/Packed.h"
+
 #include <algorithm>
 #include <bit>
 #include <cstring>
@@ -13,7 +15,7 @@ extern "C" {
 
 namespace platform::ffmpeg {
 
-static_assert(std::endian::native == std::endian::little); // samples are hashed as they stand
+constexpr bool kIsLittle = std::endian::native == std::endian::little;
 
 void SoundDigest::Release::operator()(AVMD5* state) const
 {
@@ -61,13 +63,13 @@ void SoundDigest::add(std::uint64_t frame, const std::byte* data, std::size_t fr
         return;
     frame_ += frames;
     const std::size_t samples = frames * channels_;
-    if (bits_ == width_ * 8)
+    if (kIsLittle && bits_ == width_ * 8) // as they stand
         av_md5_update(state_.get(), reinterpret_cast<const std::uint8_t*>(data), samples * width_);
     else
-        addShifted(data, samples);
+        addPacked(data, samples);
 }
 
-void SoundDigest::addShifted(const std::byte* data, std::size_t samples)
+void SoundDigest::addPacked(const std::byte* data, std::size_t samples)
 {
     constexpr std::size_t piece = 1024;
     const std::uint32_t bytes = (bits_ + 7) / 8, shift = width_ * 8 - bits_;
@@ -76,8 +78,9 @@ void SoundDigest::addShifted(const std::byte* data, std::size_t samples)
         const std::size_t count = std::min(piece, samples - done);
         for (std::size_t i = 0; i < count; ++i) {
             std::int32_t sample = 0; // at its top
-            std::memcpy(reinterpret_cast<char*>(&sample) + sizeof sample - width_, data + (done + i) * width_, width_);
-            sample >>= 32 - width_ * 8 + shift;
+            std::memcpy(reinterpret_cast<char*>(&sample) + (kIsLittle ? sizeof sample - width_ : 0),
+                        data + (done + i) * width_, width_);
+            sample = inByteOrder(sample >> (32 - width_ * 8 + shift), std::endian::little);
             std::memcpy(packed.data() + i * bytes, &sample, bytes);
         }
         av_md5_update(state_.get(), packed.data(), count * bytes);

@@ -37,7 +37,7 @@ private:
         void operator()(AVMD5* state) const;
     };
     ConvertingReader::Checksum result() const;
-    void addShifted(const std::byte* data, std::size_t samples);
+    void addPacked(const std::byte* data, std::size_t samples);
 
     Value stated_;
     std::uint32_t channels_, width_, bits_; // bytes of a sample here, its bits there

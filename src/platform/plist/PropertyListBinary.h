@@ -40,7 +40,8 @@ struct BinaryTrailer {
     Packed<std::uint64_t> topObject;         // 16
     Packed<std::uint64_t> offsetTableOffset; // 24
 
-    void swap();
+    /// From the order of the file to the host's, or back.
+    void byteOrder();
 };
 static_assert(sizeof(BinaryTrailer) == 32);
 

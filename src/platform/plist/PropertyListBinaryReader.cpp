@@ -1,5 +1,6 @@
 #include "platform/PropertyList.h"
 #include "platform/String.h"
+#include "platform/core/ByteOrder.h"
 #include "platform/core/ByteReader.h"
 #include "platform/plist/PropertyListBinary.h"
 
@@ -89,7 +90,7 @@ bool Reader::readTrailer()
         return fail("unknown version of the binary format");
     const std::uint64_t end = bytes_.size() - sizeof trailer_;
     std::memcpy(&trailer_, bytes_.data() + end, sizeof trailer_);
-    trailer_.swap();
+    trailer_.byteOrder();
 
     const auto isWidth = [](std::uint8_t width) { return width >= 1 && width <= 8; };
     if (!isWidth(trailer_.offsetSize) || !isWidth(trailer_.referenceSize))
@@ -251,11 +252,9 @@ bool Reader::readDictionary(BytesView references, int depth, Value& value)
 
 } // namespace
 
-void BinaryTrailer::swap()
+void BinaryTrailer::byteOrder()
 {
-    objectCount.swap();
-    topObject.swap();
-    offsetTableOffset.swap();
+    turnFields(std::endian::big, objectCount, topObject, offsetTableOffset);
 }
 
 bool readBinary(BytesView bytes, Value& value, std::string& problem, PropertyListReading reading)

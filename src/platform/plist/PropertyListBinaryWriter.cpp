@@ -279,7 +279,7 @@ void Writer::writeTable()
     trailer.objectCount = objects_.size();
     trailer.topObject = 0;
     trailer.offsetTableOffset = out_.size();
-    trailer.swap();
+    trailer.byteOrder();
     for (const std::uint64_t offset : offsets_)
         writeNumber(out_, offset, offsetExponent);
     out_.write(std::as_bytes(std::span(&trailer, 1)));

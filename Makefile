@@ -3,7 +3,7 @@ export JOBS ?= $(shell nproc)
 PREFIX ?= /usr/local
 FUZZ_SECONDS ?= 60
 
-.PHONY: all run test asan tsan check stress bench fuzz install package clean
+.PHONY: all run test asan tsan clang test-arm64 test-s390x check stress bench fuzz install package clean
 
 all:
 	@scripts/build release
@@ -13,6 +13,14 @@ run test:
 
 asan tsan:
 	@scripts/test $@
+
+# Library, command and tests have no warning from clang either.
+clang:
+	@scripts/build clang
+
+# The tests on other processors, emulated.
+test-arm64 test-s390x:
+	@scripts/test $(@:test-%=%)
 
 # How the sources are laid out, and what clang-tidy finds in them.
 check:

@@ -26,8 +26,8 @@ std::int32_t CAudioFileIO::OpenDecoder(platform::Error* error)
     if (!decoder)
         return status;
     const platform::StreamDescription found = decoder->clientFormat();
-    const auto floats =
-        platform::StreamDescription::packedPCM(found.sampleRate, found.channelsPerFrame, {.bits = 32, .isFloat = true});
+    const auto floats = platform::StreamDescription::packedPCM(
+        found.sampleRate, found.channelsPerFrame, {.bits = 32, .isFloat = true, .order = std::endian::native});
     if (status = decoder->setClientFormat(floats, error); status != kStatusOK)
         return status;
     constexpr std::uint64_t most = std::numeric_limits<std::int64_t>::max();

@@ -116,7 +116,9 @@ TEST(ContainersToRead, GiveTheirSamplesWithoutAModule)
         ASSERT_TRUE(reader) << status;
         EXPECT_EQ(reader->frameCount(), test.frames);
         EXPECT_EQ(reader->fileFormat().sampleRate, 8000);
-        ASSERT_EQ(reader->setClientFormat(StreamDescription::packedPCM(8000, 2, {.bits = 16})), 0);
+        ASSERT_EQ(
+            reader->setClientFormat(StreamDescription::packedPCM(8000, 2, {.bits = 16, .order = std::endian::native})),
+            0);
         const std::vector<std::int16_t> expected(kSamples.begin(),
                                                  kSamples.begin() + static_cast<std::ptrdiff_t>(test.frames) * 2);
         EXPECT_EQ(readFrom<std::int16_t>(*reader, 0, 10), expected);

@@ -13,7 +13,8 @@ using namespace platform;
 TEST(ConvertingReader, ConvertsSamplesAndChannels)
 {
     const TemporaryFolder folder;
-    const SampleFormat floats{.bits = 32, .isFloat = true}, doubles{.bits = 64, .isFloat = true};
+    const SampleFormat floats{.bits = 32, .isFloat = true, .order = std::endian::native};
+    const SampleFormat doubles{.bits = 64, .isFloat = true, .order = std::endian::native};
     const struct {
         std::uint32_t channels, wanted;
         std::vector<std::int16_t> samples;
@@ -193,7 +194,9 @@ TEST(ConvertingReader, ReadsThroughADecoderOfTheModule)
     const FakeDecoder::Module module(file);
     const auto reader = openReader(path);
     ASSERT_TRUE(reader);
-    ASSERT_EQ(reader->setClientFormat(StreamDescription::packedPCM(44100, 1, {.bits = 32, .isFloat = true})), 0);
+    ASSERT_EQ(reader->setClientFormat(
+                  StreamDescription::packedPCM(44100, 1, {.bits = 32, .isFloat = true, .order = std::endian::native})),
+              0);
     const auto values = readFrom<float>(*reader, 0, 20); // three calls of the decoder
     ASSERT_EQ(values.size(), 20U);
     EXPECT_EQ(values[19], 19.25F);

@@ -46,6 +46,9 @@ std::string writeAudio(const TemporaryFolder& folder, FourCC type, const platfor
         type, format, &status, platform::AudioFile::eraseExisting);
     EXPECT_EQ(status, 0);
     auto packets = static_cast<std::uint32_t>(samples.size() * sizeof(T) / format.bytesPerFrame);
-    EXPECT_EQ(file->writePackets(0, packets, samples.data()), 0);
+    std::vector<T> stored = samples;
+    if (format.sampleFormat().order != std::endian::native)
+        platform::swapSamples(stored.data(), sizeof(T), stored.size());
+    EXPECT_EQ(file->writePackets(0, packets, stored.data()), 0);
     return path;
 }

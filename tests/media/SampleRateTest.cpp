@@ -28,7 +28,7 @@ protected:
     TemporaryFolder folder;
 };
 
-constexpr SampleFormat kFloats{.bits = 32, .isFloat = true};
+constexpr SampleFormat kFloats{.bits = 32, .isFloat = true, .order = std::endian::native};
 
 /// A reader of a file of floats: what `sound` gives for frame and channel.
 std::unique_ptr<ConvertingReader> readerOf(const TemporaryFolder& folder, double rate, std::uint32_t channels,
@@ -38,7 +38,7 @@ std::unique_ptr<ConvertingReader> readerOf(const TemporaryFolder& folder, double
     for (std::size_t frame = 0; frame < frames; ++frame)
         for (std::uint32_t channel = 0; channel < channels; ++channel)
             samples.push_back(static_cast<float>(sound(frame, static_cast<int>(channel))));
-    auto format = StreamDescription::packedPCM(rate, channels, kFloats);
+    auto format = StreamDescription::packedPCM(rate, channels, {.bits = 32, .isFloat = true});
     return openReader(writeAudio(folder, fourCC("WAVE"), format, samples));
 }
 

@@ -61,7 +61,8 @@ public:
 
     explicit FakeDecoder(File& file) : file_(file), handle_(file.fileType)
     {
-        format_ = platform::StreamDescription::packedPCM(44100, 2, {.bits = 32, .isFloat = true});
+        format_ = platform::StreamDescription::packedPCM(44100, 2,
+                                                         {.bits = 32, .isFloat = true, .order = std::endian::native});
         fileFormat_.formatId = file.formatId;
         fileFormat_.sampleRate = 44100;
         fileFormat_.channelsPerFrame = 2;

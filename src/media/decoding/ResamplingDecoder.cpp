@@ -25,7 +25,8 @@ ResamplingDecoder::ResamplingDecoder(AudioDecoder& source, std::unique_ptr<Resam
                                      std::uint32_t rate)
     : source_(source),
       resampler_(std::move(resampler)),
-      frameFormat_(StreamDescription::packedPCM(rate, channels, {.bits = 32, .isFloat = true}))
+      frameFormat_(
+          StreamDescription::packedPCM(rate, channels, {.bits = 32, .isFloat = true, .order = std::endian::native}))
 {
     const StreamDescription& from = source.frameFormat();
     const auto sourceRate = static_cast<std::uint64_t>(from.sampleRate);

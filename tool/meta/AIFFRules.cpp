@@ -2,7 +2,7 @@
 #include "audiofile/metadata/AIFFInstrumentChunk.h"
 #include "audiofile/metadata/CommentList.h"
 #include "audiofile/metadata/MarkerList.h"
-#include "tool/meta/MetaEdit.h"
+#include "tool/meta/ChunkFields.h"
 
 #include <fmt/format.h>
 
@@ -48,25 +48,20 @@ void setText(MetaEdit& edit, const MetaStep& step)
 
 // "comt":
 
+/// A list without items, and with nothing behind them, goes.
 template <class List>
-void putList(MetaEdit& edit, FourCC id, const List& list, bool isEmpty)
+void putOrRemove(MetaEdit& edit, FourCC id, const List& list, bool isEmpty)
 {
     MetaChunk* const chunk = edit.find(id);
     if (isEmpty && chunk != nullptr)
         edit.remove(*chunk);
-    else if (chunk != nullptr)
-        edit.replace(*chunk, list.write());
     else
-        edit.add(id, list.write());
+        putChunk(edit, id, list);
 }
 
 CommentList commentsOf(MetaEdit& edit)
 {
-    const MetaChunk* const chunk = edit.find(kComments);
-    auto list = chunk != nullptr ? CommentList::read(chunk->body) : CommentList();
-    if (!list)
-        MetaEdit::refuseDamaged(kComments);
-    return *list;
+    return valueOf<CommentList>(edit, kComments);
 }
 
 template <class Change>
@@ -84,7 +79,7 @@ void changeComment(MetaEdit& edit, const MetaStep& step, Change change)
             static_cast<std::uint32_t>(std::time(nullptr)) + AIFFComment::kSecondsTo1970;
     }
     change(list, *index);
-    putList(edit, kComments, list, false);
+    putChunk(edit, kComments, list);
 }
 
 void setCommentText(MetaEdit& edit, const MetaStep& step)
@@ -104,11 +99,7 @@ void setCommentTime(MetaEdit& edit, const MetaStep& step)
 
 MarkerList markersOf(MetaEdit& edit)
 {
-    const MetaChunk* const chunk = edit.find(kMarkers);
-    auto list = chunk != nullptr ? MarkerList::read(chunk->body) : MarkerList();
-    if (!list)
-        MetaEdit::refuseDamaged(kMarkers);
-    return *list;
+    return valueOf<MarkerList>(edit, kMarkers);
 }
 
 void setCommentMarker(MetaEdit& edit, const MetaStep& step)
@@ -129,7 +120,7 @@ void removeComment(MetaEdit& edit, const MetaStep& step)
         MetaEdit::refuseDamaged(kComments);
     list.comments.erase(list.comments.begin() + static_cast<std::ptrdiff_t>(*index));
     edit.itemRemoved(step, 0);
-    putList(edit, kComments, list, list.comments.empty() && list.behind.empty());
+    putOrRemove(edit, kComments, list, list.comments.empty() && list.behind.empty());
 }
 
 // "mark":
@@ -154,7 +145,7 @@ void changeMarker(MetaEdit& edit, const MetaStep& step, Change change)
         list.markers.emplace_back().id = static_cast<std::int16_t>(id + 1);
     }
     change(list, list.markers[*index]);
-    putList(edit, kMarkers, list, false);
+    putChunk(edit, kMarkers, list);
 }
 
 void setMarkerName(MetaEdit& edit, const MetaStep& step)
@@ -180,7 +171,7 @@ void renameMarker(MetaEdit& edit, std::int16_t from, std::int16_t to)
         for (std::size_t i = 0; i < list.comments.size(); ++i)
             if (list.comments[i].marker == from && !edit.names(fmt::format("comt[{}].marker", i)))
                 list.comments[i].marker = to;
-        putList(edit, kComments, list, false);
+        putChunk(edit, kComments, list);
     }
     MetaChunk* const chunk = edit.find(kInstrument);
     auto instrument = chunk != nullptr ? AIFFInstrumentChunk::read(chunk->body) : std::nullopt;
@@ -224,7 +215,7 @@ void removeMarker(MetaEdit& edit, const MetaStep& step)
         renameMarker(edit, marker.id, 0);
     list.markers.erase(list.markers.begin() + static_cast<std::ptrdiff_t>(*index));
     edit.itemRemoved(step, 0);
-    putList(edit, kMarkers, list, list.markers.empty() && list.behind.empty());
+    putOrRemove(edit, kMarkers, list, list.markers.empty() && list.behind.empty());
 }
 
 void removeMarkers(MetaEdit& edit, const MetaStep&)

@@ -2,7 +2,7 @@
 #include "audiofile/metadata/CAFMarkers.h"
 #include "audiofile/metadata/CAFStringTable.h"
 #include "audiofile/metadata/CAFTextPairs.h"
-#include "tool/meta/MetaEdit.h"
+#include "tool/meta/ChunkFields.h"
 #include "tool/shared/arguments/Nearest.h"
 #include "tool/shared/output/Terminal.h"
 
@@ -69,20 +69,7 @@ void setInfo(MetaEdit& edit, const MetaStep& step)
 
 CAFStringTable stringsOf(MetaEdit& edit)
 {
-    const MetaChunk* const chunk = edit.find(kStrings);
-    auto table = chunk != nullptr ? CAFStringTable::read(chunk->body) : CAFStringTable();
-    if (!table)
-        MetaEdit::refuseDamaged(kStrings);
-    return *table;
-}
-
-template <class List>
-void put(MetaEdit& edit, FourCC id, const List& list)
-{
-    if (MetaChunk* const chunk = edit.find(id))
-        edit.replace(*chunk, list.write());
-    else
-        edit.add(id, list.write());
+    return valueOf<CAFStringTable>(edit, kStrings);
 }
 
 std::uint32_t freeTextId(MetaEdit& edit, const CAFStringTable& table)
@@ -146,16 +133,12 @@ void setString(MetaEdit& edit, const MetaStep& step)
     if (*index == table.entries.size())
         addText(table, freeTextId(edit, table));
     setTextOf(table, table.entries[*index], step.string());
-    put(edit, kStrings, table);
+    putChunk(edit, kStrings, table);
 }
 
 CAFMarkerList markersOf(MetaEdit& edit)
 {
-    const MetaChunk* const chunk = edit.find(kMarkers);
-    auto list = chunk != nullptr ? CAFMarkerList::read(chunk->body) : CAFMarkerList();
-    if (!list)
-        MetaEdit::refuseDamaged(kMarkers);
-    return *list;
+    return valueOf<CAFMarkerList>(edit, kMarkers);
 }
 
 template <class Change>
@@ -176,7 +159,7 @@ void changeMarker(MetaEdit& edit, const MetaStep& step, Change change)
         none.subFrameSampleOffset = 0xFFFFFFFF;
     }
     change(list, list.markers[*index]);
-    put(edit, kMarkers, list);
+    putChunk(edit, kMarkers, list);
 }
 
 void setPosition(MetaEdit& edit, const MetaStep& step)
@@ -219,7 +202,7 @@ void setMarkerName(MetaEdit& edit, const MetaStep& step)
             marker.id = id;
         }
         setTextOf(table, *entry, step.string());
-        put(edit, kStrings, table);
+        putChunk(edit, kStrings, table);
     });
 }
 
@@ -236,7 +219,7 @@ void removeMarker(MetaEdit& edit, const MetaStep& step)
     if (list.markers.empty() && list.behind.empty())
         edit.remove(*edit.find(kMarkers));
     else
-        put(edit, kMarkers, list);
+        putChunk(edit, kMarkers, list);
 }
 
 using K = MetaKind;

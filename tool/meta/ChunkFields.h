@@ -24,6 +24,27 @@ void assign(Packed<T>& field, const MetaStep& step)
         field = static_cast<T>(step.number());
 }
 
+/// The chunk of an id; an empty one where there is none. Refuses one that is damaged.
+template <class Chunk>
+Chunk valueOf(MetaEdit& edit, FourCC id)
+{
+    const MetaChunk* const chunk = edit.find(id);
+    auto value = chunk != nullptr ? Chunk::read(chunk->body) : Chunk();
+    if (!value)
+        MetaEdit::refuseDamaged(id);
+    return *value;
+}
+
+/// In the place of that of its id, or as a new one.
+template <class Chunk>
+void putChunk(MetaEdit& edit, FourCC id, const Chunk& value)
+{
+    if (MetaChunk* const chunk = edit.find(id))
+        edit.replace(*chunk, value.write());
+    else
+        edit.add(id, value.write());
+}
+
 constexpr FourCC kListId = fourCC("LIST");
 
 /// A list without items goes.

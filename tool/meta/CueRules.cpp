@@ -18,11 +18,7 @@ constexpr double kMost16 = 65535, kMost32 = 4294967295.0, kNoLimit = 1e9;
 
 CueList cuesOf(MetaEdit& edit)
 {
-    const MetaChunk* const chunk = edit.find(kCue);
-    auto cues = chunk != nullptr ? CueList::read(chunk->body) : CueList();
-    if (!cues)
-        MetaEdit::refuseDamaged(kCue);
-    return *cues;
+    return valueOf<CueList>(edit, kCue);
 }
 
 void putCues(MetaEdit& edit, const CueList& cues)

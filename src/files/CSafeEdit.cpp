@@ -88,6 +88,8 @@ bool CSafeEdit::isOwnBackup(const std::string& name) const
 std::string CSafeEdit::ownBackup() const
 {
     FileStatus found;
+    if (status_.links == 1) // not a look at every backup there is
+        return "";
     for (int number = 0; number < kMostBackups; ++number) {
         std::string name = backupName(target_, number);
         if (isOwnBackup(name))

@@ -1,5 +1,6 @@
-// Samples to floats and back: 256 KiB of samples, in the cache.
+// Samples to floats and back, and their extremes: 256 KiB of samples, in the cache.
 #include "media/samples/SampleConversion.h"
+#include "media/samples/SampleExtremes.h"
 
 #include <benchmark/benchmark.h>
 
@@ -43,6 +44,21 @@ void writeSamples(benchmark::State& state)
     state.SetBytesProcessed(static_cast<std::int64_t>(state.iterations()) * std::int64_t{kBytes});
 }
 
+// Runs as overviews have them: 256 frames of stereo.
+void findExtremes(benchmark::State& state)
+{
+    constexpr std::size_t run = 512;
+    const platform::SampleFormat format = formatOf(state);
+    const std::vector<unsigned char> samples(kBytes, 0x35);
+    const std::size_t runs = kBytes / static_cast<std::size_t>(format.bytesPerSample()) / run;
+    std::vector<platform::SampleExtremes> extremes(runs);
+    for (auto _ : state) {
+        platform::sampleExtremes(samples.data(), format, run, runs, extremes.data());
+        benchmark::ClobberMemory();
+    }
+    state.SetBytesProcessed(static_cast<std::int64_t>(state.iterations()) * std::int64_t{kBytes});
+}
+
 // Bits of a sample (negative: floats), and whether they are big-endian.
 void formats(benchmark::internal::Benchmark* bench)
 {
@@ -52,5 +68,6 @@ void formats(benchmark::internal::Benchmark* bench)
 BENCHMARK(readSamples<platform::samplesToFloat>)->Name("samplesToFloat")->Apply(formats);
 BENCHMARK(readSamples<platform::samplesToFloatPlain>)->Name("samplesToFloatPlain")->Apply(formats);
 BENCHMARK(writeSamples<platform::floatToSamples>)->Name("floatToSamples")->Apply(formats);
+BENCHMARK(findExtremes)->Name("sampleExtremes")->Apply(formats);
 
 } // namespace

@@ -1,4 +1,4 @@
-#include "media/samples/SampleExtremes.h"
+#include "media/samples/SampleRoads.h"
 
 #include "platform/core/Bytes.h"
 
@@ -19,8 +19,19 @@ std::array<float, 4> values(const SampleExtremes& extremes)
     return {extremes.lowest[0], extremes.lowest[1], extremes.highest[0], extremes.highest[1]};
 }
 
+// The roads that this processor can take.
+std::vector<decltype(&platform::sampleExtremes)> fastRoads()
+{
+    std::vector<decltype(&platform::sampleExtremes)> roads{platform::sampleExtremes};
+    if (platform::hasFastRoads())
+        roads.push_back(platform::sampleExtremesFast);
+    if (platform::hasWiderRoads())
+        roads.push_back(platform::sampleExtremesWider);
+    return roads;
+}
+
 // Random bytes are every integer there is; of floats they are huge numbers, infinities and NaNs as well.
-TEST(SampleExtremes, FastRoadEqualsPlainRoadOnRandomBytes)
+TEST(SampleExtremes, FastRoadsEqualPlainRoadOnRandomBytes)
 {
     std::mt19937 random(20);
     for (const endian order : {endian::little, endian::big})
@@ -28,7 +39,7 @@ TEST(SampleExtremes, FastRoadEqualsPlainRoadOnRandomBytes)
                                           SampleFormat{16, false, false, order}, SampleFormat{24, false, false, order},
                                           SampleFormat{32, false, false, order}, SampleFormat{32, true, false, order},
                                           SampleFormat{64, true, false, order}})
-            for (std::size_t samplesPerRun = 0; samplesPerRun < 150; ++samplesPerRun) {
+            for (std::size_t samplesPerRun = 0; samplesPerRun < 300; ++samplesPerRun) {
                 const std::size_t runs = 1 + random() % 4;
                 const std::size_t offset = random() % 9; // no alignment
                 const std::size_t size = samplesPerRun * runs * static_cast<std::size_t>(format.bytesPerSample());
@@ -38,12 +49,14 @@ TEST(SampleExtremes, FastRoadEqualsPlainRoadOnRandomBytes)
                 bytes.shrink_to_fit(); // a sanitizer sees a read beyond
                 std::vector<SampleExtremes> fast(runs);
                 std::vector<SampleExtremes> plain(runs);
-                platform::sampleExtremes(bytes.data() + offset, format, samplesPerRun, runs, fast.data());
                 platform::sampleExtremesPlain(bytes.data() + offset, format, samplesPerRun, runs, plain.data());
-                for (std::size_t run = 0; run < runs; ++run)
-                    ASSERT_EQ(values(fast[run]), values(plain[run]))
-                        << format.bits << (format.isFloat ? " float " : " int ") << (order == endian::big) << ' '
-                        << samplesPerRun;
+                for (const auto road : fastRoads()) {
+                    road(bytes.data() + offset, format, samplesPerRun, runs, fast.data());
+                    for (std::size_t run = 0; run < runs; ++run)
+                        ASSERT_EQ(values(fast[run]), values(plain[run]))
+                            << format.bits << (format.isFloat ? " float " : " int ") << (order == endian::big) << ' '
+                            << samplesPerRun;
+                }
             }
 }
 

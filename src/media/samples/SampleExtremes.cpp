@@ -41,7 +41,9 @@ void sampleExtremesPlain(const void* samples, SampleFormat format, std::size_t s
 void sampleExtremes(const void* samples, SampleFormat format, std::size_t samplesPerRun, std::size_t runs,
                     SampleExtremes* to)
 {
-    if (hasFastRoads())
+    if (hasWiderRoads())
+        sampleExtremesWider(samples, format, samplesPerRun, runs, to);
+    else if (hasFastRoads())
         sampleExtremesFast(samples, format, samplesPerRun, runs, to);
     else
         sampleExtremesPlain(samples, format, samplesPerRun, runs, to);

@@ -47,4 +47,19 @@ void sampleExtremesFast(const void* samples, SampleFormat format, std::size_t sa
 
 #endif
 
+#if !defined(KT_AVX2)
+
+bool hasWiderRoads()
+{
+    return false;
+}
+
+void sampleExtremesWider(const void* samples, SampleFormat format, std::size_t samplesPerRun, std::size_t runs,
+                         SampleExtremes* to)
+{
+    sampleExtremesFast(samples, format, samplesPerRun, runs, to);
+}
+
+#endif
+
 } // namespace platform

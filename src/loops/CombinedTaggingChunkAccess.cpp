@@ -1,7 +1,7 @@
 #include "loops/CombinedTaggingChunkAccess.h"
 
 #include "loops/VireoLoopBaseChunk.h"
-#include "loops/VireoLoopCombinedTagsChunkDataTypes.h"
+#include "loops/VireoLoopCombinedTagsChunkData.h"
 #include "loops/VireoLoopUserDataUtils.h"
 
 using Types = VireoLoopCombinedTagsChunkDataTypes;
@@ -13,6 +13,9 @@ void CombinedTaggingAifChunkReader::readChunk()
     const auto categories = UserData::read(file_, tagging::kCategories, 0);
     if (!basic && !categories)
         return;
+    if (auto* tags = chunk_.chunkDataOfClass<VireoLoopCombinedTagsChunkData>()) // without the archive in between
+        return tags->setDataDictionary(Types::combinedTagsChunkDataDictionaryFromAifChunks(
+            basic ? BytesView(*basic) : BytesView(), categories ? BytesView(*categories) : BytesView()));
     const auto archive = Types::combinedAifChunkDataFrom(basic.value_or(Bytes()), categories.value_or(Bytes()));
     if (archive)
         chunk_.chunkData().setChunkData(*archive, fourCC("AIFF"));

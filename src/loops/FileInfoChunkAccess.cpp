@@ -1,7 +1,7 @@
 #include "loops/FileInfoChunkAccess.h"
 
 #include "loops/VireoLoopBaseChunk.h"
-#include "loops/VireoLoopFileInfoChunkDataTypes.h"
+#include "loops/VireoLoopFileInfoChunkData.h"
 #include "loops/VireoLoopUserDataUtils.h"
 #include "platform/KeyedArchive.h"
 #include "platform/String.h"
@@ -40,6 +40,11 @@ void FileInfoCafChunkReader::readChunk()
         return text == nullptr || !platform::String::fromUTF8(entry.first) || !platform::String::fromUTF8(*text);
     });
     // Where the file says none of them the object stays as it is.
+    if (auto* info = chunk_.chunkDataOfClass<VireoLoopFileInfoChunkData>()) { // without the archive in between
+        if (Dictionary known = Types::fileInfoChunkDataDictionaryFromCafInformation(information); !known.empty())
+            info->setDataDictionary(std::move(known));
+        return;
+    }
     const auto archive = platform::archiveDictionary(information);
     if (archive && !Types::fileInfoChunkDataDictionaryFromCafChunkData(*archive).empty())
         chunk_.chunkData().setChunkData(*archive, fourCC("caff"));
@@ -76,6 +81,8 @@ void FileInfoAifChunkReader::readChunk()
     }
     if (texts.empty())
         return;
+    if (auto* info = chunk_.chunkDataOfClass<VireoLoopFileInfoChunkData>()) // without the archive in between
+        return info->setDataDictionary(Types::fileInfoChunkDataDictionaryFromAifTexts(texts));
     if (const auto archive = platform::archiveDictionary(texts))
         chunk_.chunkData().setChunkData(*archive, fourCC("AIFF"));
 }

@@ -17,7 +17,6 @@
 #include <charconv>
 #include <cmath>
 #include <map>
-#include <set>
 
 namespace {
 
@@ -76,8 +75,9 @@ public:
 
     void add(FourCC id, BytesView body)
     {
-        if (!seen_.insert(id).second && id != kLIST)
+        if (id != kLIST && std::ranges::find(seen_, id) != seen_.end())
             return;
+        seen_.push_back(id);
         if (id == fourCC("acid"))
             addAcid(AcidChunk::read(body, order_));
         else if (id == fourCC("smpl"))
@@ -247,8 +247,8 @@ private:
     static BytesView asBytes(const std::string& text) { return std::as_bytes(std::span(text)); }
 
     std::endian order_;
-    std::set<FourCC> seen_;
-    bool rootIsOpen_ = false; // "acid" says that there is none
+    std::vector<FourCC> seen_; // a handful of kinds
+    bool rootIsOpen_ = false;  // "acid" says that there is none
     std::optional<CueList> cues_;
     std::optional<AssociatedDataList> names_;
     std::optional<MarkerList> markers_;

@@ -8,6 +8,7 @@
 
 #include <memory>
 #include <optional>
+#include <typeinfo>
 
 class KT_EXPORT VireoLoopBaseChunk {
 public:
@@ -26,6 +27,13 @@ public:
     bool cafChunkIsUUIDChunk() const { return cafChunkUUID_ != nullptr; }
     VireoLoopChunkData& chunkData() { return *chunkData_; }
     const VireoLoopChunkData& chunkData() const { return *chunkData_; }
+    /// The data object where it is of that class itself; null for a derived one, which may read archives its own way.
+    template <class Data>
+    Data* chunkDataOfClass()
+    {
+        VireoLoopChunkData& data = *chunkData_;
+        return typeid(data) == typeid(Data) ? static_cast<Data*>(&data) : nullptr;
+    }
 
     virtual std::unique_ptr<ChunkReader> cafChunkReader(platform::AudioFile& file);
     virtual std::unique_ptr<ChunkReader> aifChunkReader(platform::AudioFile& file);

@@ -71,6 +71,7 @@ template <class... Chunks>
 VireoLoopChunkList oneOfEach()
 {
     VireoLoopChunkList list;
+    list.reserve(sizeof...(Chunks));
     (list.push_back(std::make_unique<Chunks>()), ...);
     return list;
 }

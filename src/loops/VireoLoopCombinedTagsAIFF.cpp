@@ -76,13 +76,19 @@ void readBasicTagging(BytesView bytes, Dictionary& tags)
 /// The descriptors that the bytes hold, at most `claimed`; one that is not UTF-8 is skipped.
 platform::Array descriptorsIn(BytesView bytes, std::size_t claimed)
 {
-    std::vector<std::string> texts;
+    std::vector<std::string_view> texts;
+    texts.reserve(std::min(claimed, bytes.size() / kCategoryTextSize));
     for (std::size_t i = 0; i < std::min(claimed, bytes.size() / kCategoryTextSize); ++i)
-        if (const auto text = platform::String::fromUTF8(fieldText(bytes.data() + i * kCategoryTextSize)))
-            texts.push_back(text.utf8());
+        if (const std::string_view text = fieldText(bytes.data() + i * kCategoryTextSize);
+            platform::String::fromUTF8(text))
+            texts.push_back(text);
     std::sort(texts.begin(), texts.end());
     texts.erase(std::unique(texts.begin(), texts.end()), texts.end());
-    return {texts.begin(), texts.end()};
+    platform::Array descriptors;
+    descriptors.reserve(texts.size());
+    for (const std::string_view text : texts)
+        descriptors.emplace_back(std::string(text));
+    return descriptors;
 }
 
 void readCategories(BytesView bytes, Dictionary& tags)
@@ -172,10 +178,17 @@ VireoLoopCombinedTagsChunkDataTypes::combinedTagsChunkDataDictionaryFromAifChunk
 {
     if (archive.empty())
         return std::nullopt;
-    Dictionary tags;
     auto parts = platform::unarchiveDictionary(archive);
-    readBasicTagging(takeEntry(parts, VireoLoopCombinedBasicTaggingDataKey), tags);
-    readCategories(takeEntry(parts, VireoLoopCombinedCategoryDataKey), tags);
+    return combinedTagsChunkDataDictionaryFromAifChunks(takeEntry(parts, VireoLoopCombinedBasicTaggingDataKey),
+                                                        takeEntry(parts, VireoLoopCombinedCategoryDataKey));
+}
+
+Dictionary VireoLoopCombinedTagsChunkDataTypes::combinedTagsChunkDataDictionaryFromAifChunks(BytesView basicTaggingData,
+                                                                                             BytesView categoryData)
+{
+    Dictionary tags;
+    readBasicTagging(basicTaggingData, tags);
+    readCategories(categoryData, tags);
     return tags;
 }
 

@@ -37,6 +37,9 @@ class KT_EXPORT VireoLoopCombinedTagsChunkDataTypes {
 public:
     /// combinedTagsChunkDataDictionaryFromAifChunkData: — `archive` is the combined form; none for empty bytes.
     static std::optional<platform::Dictionary> combinedTagsChunkDataDictionaryFromAifChunkData(BytesView archive);
+    /// What the former gives for the archive of these parts, of which either may be empty, without the archive.
+    static platform::Dictionary combinedTagsChunkDataDictionaryFromAifChunks(BytesView basicTaggingData,
+                                                                             BytesView categoryData);
     /// aifChunkDataFromCombinedTagsChunkDataDictionary: — texts are cut at 49 bytes.
     static std::optional<Bytes> aifChunkDataFromCombinedTagsChunkDataDictionary(const platform::Dictionary& tags);
     /// combinedTagsChunkDataDictionaryFromCafChunkData: — `payload` is the string pairs behind the UUID.

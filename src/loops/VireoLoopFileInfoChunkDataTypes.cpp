@@ -77,8 +77,7 @@ std::string_view trimmed(std::string_view text)
 
 Dictionary VireoLoopFileInfoChunkDataTypes::fileInfoChunkDataDictionaryFromAifChunkData(BytesView archive)
 {
-    return rekeyed(platform::unarchiveDictionary(archive).value_or(Dictionary()), &FileInfoKey::aiffKey,
-                   &FileInfoKey::key);
+    return fileInfoChunkDataDictionaryFromAifTexts(platform::unarchiveDictionary(archive).value_or(Dictionary()));
 }
 
 std::optional<Bytes>
@@ -89,14 +88,23 @@ VireoLoopFileInfoChunkDataTypes::aifChunkDataFromFileInfoChunkDataDictionary(con
 
 Dictionary VireoLoopFileInfoChunkDataTypes::fileInfoChunkDataDictionaryFromCafChunkData(BytesView archive)
 {
-    return rekeyed(platform::unarchiveDictionary(archive).value_or(Dictionary()), &FileInfoKey::cafKey,
-                   &FileInfoKey::key);
+    return fileInfoChunkDataDictionaryFromCafInformation(platform::unarchiveDictionary(archive).value_or(Dictionary()));
 }
 
 std::optional<Bytes>
 VireoLoopFileInfoChunkDataTypes::cafChunkDataFromFileInfoChunkDataDictionary(const Dictionary& info)
 {
     return platform::archiveDictionary(rekeyed(info, &FileInfoKey::key, &FileInfoKey::cafKey));
+}
+
+Dictionary VireoLoopFileInfoChunkDataTypes::fileInfoChunkDataDictionaryFromAifTexts(const Dictionary& texts)
+{
+    return rekeyed(texts, &FileInfoKey::aiffKey, &FileInfoKey::key);
+}
+
+Dictionary VireoLoopFileInfoChunkDataTypes::fileInfoChunkDataDictionaryFromCafInformation(const Dictionary& information)
+{
+    return rekeyed(information, &FileInfoKey::cafKey, &FileInfoKey::key);
 }
 
 std::uint32_t VireoLoopFileInfoChunkDataTypes::fileInfoTypeForKey(std::string_view key)

@@ -24,6 +24,11 @@ public:
     static platform::Dictionary fileInfoChunkDataDictionaryFromCafChunkData(BytesView archive);
     static std::optional<Bytes> cafChunkDataFromFileInfoChunkDataDictionary(const platform::Dictionary& info);
 
+    /// What the readers of archives give for the archive of these texts, without the archive: by AIFF key, and by CAF
+    /// key as the "info" chunk has them.
+    static platform::Dictionary fileInfoChunkDataDictionaryFromAifTexts(const platform::Dictionary& texts);
+    static platform::Dictionary fileInfoChunkDataDictionaryFromCafInformation(const platform::Dictionary& information);
+
     /// fileInfoTypeForKey: — the AIFF chunk id; 0 for any other key.
     static std::uint32_t fileInfoTypeForKey(std::string_view key);
     /// fileInfoKeyForKey: — the key in the AIFF archive; "" for any other key.

@@ -1,11 +1,14 @@
 // Damaged loop files: what can be read is read, the rest is left out, and memory stays in proportion to the file.
 #include "LoopFiles.h"
+#include "loops/CombinedTaggingChunkAccess.h"
+#include "loops/FileInfoChunkAccess.h"
 #include "support/FaultInjection.h"
 
 #include <cstdlib>
 #include <filesystem>
 #include <malloc.h>
 #include <new>
+#include <random>
 
 using namespace std::string_literals;
 
@@ -180,6 +183,37 @@ const Case inCAF[] = {
 
 } // namespace
 
+/// A chunk whose data object is of a class derived from the usual one, so that it is read by way of an archive.
+template <class Chunk, class Data>
+struct ReadByArchive : VireoLoopBaseChunk {
+    struct Derived : Data {};
+    ReadByArchive() : VireoLoopBaseChunk(Chunk().aifChunkID(), {}, nullptr, std::make_unique<Derived>()) {}
+    const platform::Dictionary& tags() { return static_cast<Derived&>(chunkData()).dataDictionary(); }
+};
+
+/// What is read straight from the file is what archives say, as those of derived classes must still be told.
+void expectWhatArchivesSay(const std::string& path)
+{
+    VireoLoopFileInfoChunk info;
+    VireoLoopCombinedTaggingChunk combined;
+    ReadByArchive<VireoLoopFileInfoChunk, VireoLoopFileInfoChunkData> archivedInfo;
+    ReadByArchive<VireoLoopCombinedTaggingChunk, VireoLoopCombinedTagsChunkData> archivedTags;
+    VireoLoopChunksManager manager = manage(path, false);
+    ASSERT_NE(manager.audioFile(), nullptr);
+    platform::AudioFile& file = *manager.audioFile();
+    if (manager.audioFileTypeID() == kAIFF) {
+        FileInfoAifChunkReader(file, info).readChunk();
+        FileInfoAifChunkReader(file, archivedInfo).readChunk();
+        CombinedTaggingAifChunkReader(file, combined).readChunk();
+        CombinedTaggingAifChunkReader(file, archivedTags).readChunk();
+    } else {
+        FileInfoCafChunkReader(file, info).readChunk();
+        FileInfoCafChunkReader(file, archivedInfo).readChunk();
+    }
+    EXPECT_EQ(info.fileInfo().dataDictionary(), archivedInfo.tags());
+    EXPECT_EQ(combined.tags().dataDictionary(), archivedTags.tags());
+}
+
 class DamagedLoopFile : public testing::Test {
 protected:
     void expectReadable(FourCC container, const Case& each)
@@ -194,6 +228,7 @@ protected:
                 if (found.contains(key) && (found[key] == "0" || key == "FileType"s))
                     found.erase(key);
             EXPECT_EQ(found, each.expected);
+            expectWhatArchivesSay(path);
 
             ASSERT_TRUE(manage(path).writeChunks(everyKind(12)));
             EXPECT_EQ(tagsOf(path), keptIn(container, everyKind(12))) << "it can be written over";
@@ -211,6 +246,25 @@ TEST_F(DamagedLoopFile, WhatCanBeReadIsRead)
         expectReadable(kAIFF, each);
     for (const Case& each : inCAF)
         expectReadable(kCAF, each);
+}
+
+TEST_F(DamagedLoopFile, SaysWhatItsArchiveSays)
+{
+    std::mt19937 random(18);
+    for (const FourCC container : {kAIFF, kCAF}) {
+        const std::string path = folder.write("file", audioFile(container));
+        ASSERT_TRUE(manage(path).writeChunks(everyKind(20)));
+        const Bytes whole = readFile(path);
+        expectWhatArchivesSay(path);
+        for (int round = 0; round < 300; ++round) { // the headers of the tags stay mostly whole
+            Bytes damaged = whole;
+            for (int i = 0; i < 8; ++i)
+                damaged[damaged.size() / 8 + random() % (damaged.size() * 7 / 8)] = static_cast<std::byte>(random());
+            folder.write("file", damaged);
+            if (manage(path, false).audioFile() != nullptr)
+                expectWhatArchivesSay(path);
+        }
+    }
 }
 
 namespace {

@@ -19,7 +19,10 @@ constexpr std::size_t kBatch = 64;
 constexpr unsigned kBatchesPerThread = 8;
 
 using Batch = std::vector<FoundFile>;
-using Records = std::vector<ScanRecord>;
+struct Records {
+    std::vector<ScanRecord> records;
+    std::int64_t files = 0;
+};
 using ScanWork = OrderedWork<Batch, Records>;
 
 struct ScanArguments {
@@ -62,26 +65,23 @@ public:
     ResultWriter(ScanWriter& writer, FilesProgress& progress) : writer_(writer), progress_(progress) {}
 
     /// False when no more is wanted.
-    bool add(Records records)
+    bool add(Records scanned)
     {
         Output& output = Output::standard();
         const bool sharesTerminal = progress_.isActive() && isTerminal(STDOUT_FILENO);
-        const bool prints = std::any_of(records.begin(), records.end(),
-                                        [](const ScanRecord& record) { return record.kind == ScanRecord::loop; });
-        files_ += std::ssize(records);
-        for (ScanRecord& record : records)
-            if (record.kind != ScanRecord::none) {
-                writer_.add(record);
-                if (record.kind == ScanRecord::loop)
-                    ++loops_;
-                else
-                    bad_.push_back({std::move(record.path), std::move(record.text)});
-            }
-        if (sharesTerminal && prints)
+        const std::int64_t loopsBefore = loops_;
+        files_ += scanned.files;
+        for (ScanRecord& record : scanned.records) {
+            writer_.add(record);
+            loops_ += static_cast<std::int64_t>(record.loops);
+            if (record.kind == ScanRecord::bad)
+                bad_.push_back({std::move(record.path), std::move(record.text)});
+        }
+        if (sharesTerminal && loops_ > loopsBefore)
             output.flush();
         if (output.failed())
             return false;
-        progress_.advance(std::ssize(records));
+        progress_.advance(scanned.files);
         return true;
     }
     const std::vector<BadFile>& bad() const { return bad_; }
@@ -149,10 +149,10 @@ bool runScan(const ScanArguments& arguments, const OutputOptions& options)
             folders, threadsFor(arguments.threads),
             [form, &progress](const Batch& batch) {
                 progress.begin(batch.front().path);
-                Records records;
+                Records scanned{{}, std::ssize(batch)};
                 for (const FoundFile& file : batch)
-                    records.push_back(scanFile(file, form));
-                return records;
+                    addTo(scanned.records, scanFile(file, form), form);
+                return scanned;
             },
             results);
     }

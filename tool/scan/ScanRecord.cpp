@@ -5,6 +5,7 @@
 #include "tool/shared/output/ShownName.h"
 
 #include <algorithm>
+#include <array>
 #include <cctype>
 #include <iterator>
 #include <new>
@@ -22,32 +23,38 @@ bool isCalledLoop(const std::string& path)
     return std::ranges::find(kExtensions, extension) != std::end(kExtensions);
 }
 
-// The tags of `names`, each in one line.
-std::vector<std::string> cells(const LoopTags& tags, std::initializer_list<const char*> names)
+// What a row shows of a loop: of keys the words.
+template <std::size_t count>
+std::array<TagText, count> textsCalled(const char* const (&names)[count])
 {
-    std::vector<std::string> row;
-    for (const char* name : names)
-        row.push_back(name == std::string_view("key") ? keyWords(tags) : tagText(tags, name));
-    return row;
+    std::array<TagText, count> texts;
+    std::ranges::transform(names, texts.begin(),
+                           [](std::string_view name) { return name == "key" ? keyWords : tagTextCalled(name); });
+    return texts;
 }
 
-void fill(ScanRecord& record, const LoopTags& tags, Form form)
+void fill(ScanRecord& record, const std::string& path, const LoopTags& tags, Form form)
 {
     record.kind = ScanRecord::loop;
+    record.loops = 1;
     if (form == Form::json) {
         JsonWriter json;
-        writeLoopTags(json, shownName(record.path), tags);
+        writeLoopTags(json, shownName(path), tags);
         record.text = json.text();
     } else if (form == Form::csv) {
-        record.text = loopRow(shownName(record.path), tags);
+        record.text = loopRow(shownName(path), tags);
     } else if (form == Form::table) {
-        record.cells = cells(tags, {"tempo", "beatCount", "key", "signature", "instrumentType", "genre"});
-        record.cells.push_back(printable(shownName(record.path)));
+        static const auto texts = textsCalled({"tempo", "beatCount", "key", "signature", "instrumentType", "genre"});
+        for (const TagText text : texts)
+            record.cells.push_back(text(tags));
+        record.cells.push_back(printable(shownName(path)));
     } else if (form == Form::lines) {
-        record.text = printable(shownName(record.path)) + "\t" + loopContainerName(tags.fileType);
-        for (const std::string& cell : cells(tags, {"tempo", "beatCount", "key", "signature", "instrumentType",
-                                                    "instrumentSubType", "genre", "descriptors"}))
-            record.text += "\t" + cell;
+        record.text = printable(shownName(path));
+        (record.text += '\t') += loopContainerName(tags.fileType);
+        static const auto texts = textsCalled(
+            {"tempo", "beatCount", "key", "signature", "instrumentType", "instrumentSubType", "genre", "descriptors"});
+        for (const TagText text : texts)
+            (record.text += '\t') += text(tags);
         record.text += '\n';
     }
 }
@@ -57,18 +64,14 @@ void fill(ScanRecord& record, const LoopTags& tags, Form form)
 ScanRecord scanFile(const FoundFile& item, Form form)
 {
     ScanRecord record;
-    record.path = item.path;
-    const auto fail = [&](const std::string& text) {
-        record.kind = ScanRecord::bad;
-        record.text = text;
-    };
+    const auto fail = [&](const std::string& text) { record = {ScanRecord::bad, item.path, text, {}}; };
     if (!item.problem.empty()) {
         fail(item.problem);
         return record;
     }
     try {
         if (const LoopTags tags = readLoopTags(item.path); tags.isLoop())
-            fill(record, tags, form);
+            fill(record, item.path, tags, form);
     } catch (const OtherKind& other) {
         if (!other.isAudio() && isCalledLoop(item.path))
             fail(other.what());
@@ -80,6 +83,19 @@ ScanRecord scanFile(const FoundFile& item, Form form)
         fail("out of memory");
     }
     return record;
+}
+
+void addTo(std::vector<ScanRecord>& records, ScanRecord record, Form form)
+{
+    if (record.kind == ScanRecord::none)
+        return;
+    const bool isLine = record.kind == ScanRecord::loop && (form == Form::lines || form == Form::none);
+    if (!isLine || records.empty() || records.back().kind != ScanRecord::loop) {
+        records.push_back(std::move(record));
+        return;
+    }
+    records.back().text += record.text;
+    records.back().loops += record.loops;
 }
 
 // Rows are written as they come, so that the widths are set beforehand; the path, which no width fits, comes last.

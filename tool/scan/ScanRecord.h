@@ -12,9 +12,10 @@
 struct ScanRecord {
     enum Kind { none, loop, bad };
     Kind kind = none;
-    std::string path;
-    std::string text;               // of a loop the record, of a bad file what is wrong
+    std::string path;               // of a bad file
+    std::string text;               // of a loop the record, of several their lines; of a bad file what is wrong
     std::vector<std::string> cells; // of a loop in a table
+    std::size_t loops = 0;
 };
 
 /// Reads one file. A loop is an AIFF or CAF file that has loop tags, transients or another loop chunk, and one of
@@ -22,6 +23,9 @@ struct ScanRecord {
 /// but of the files that hold no known audio, and of links to nothing, only those that are called so (".wav", ".aif",
 /// ".aiff", ".aifc", ".caf"). Throws nothing.
 ScanRecord scanFile(const FoundFile& file, Form form);
+
+/// Adds what is to be written: lines join those ahead of them, which spares the threads the handing over of each.
+void addTo(std::vector<ScanRecord>& records, ScanRecord record, Form form);
 
 /// Writes the records of the loops, and in JSON and CSV those of bad files.
 class ScanWriter {

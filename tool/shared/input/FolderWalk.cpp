@@ -54,9 +54,9 @@ bool FolderWalk::run()
     });
 }
 
-bool FolderWalk::visit(const std::string& path, const std::string& problem) const
+bool FolderWalk::visit(std::string path, std::string problem) const
 {
-    return visit_({path, problem, rootLength_});
+    return visit_({std::move(path), std::move(problem), rootLength_});
 }
 
 std::vector<FolderWalk::Entry> FolderWalk::entriesOf(const std::string& folder, int& error)
@@ -94,20 +94,20 @@ bool FolderWalk::walk(const std::string& folder)
                        [&](const Entry& entry) { return visitEntry(joined(folder, entry.name), entry); });
 }
 
-bool FolderWalk::visitEntry(const std::string& path, const Entry& entry)
+bool FolderWalk::visitEntry(std::string path, const Entry& entry)
 {
     if (entry.type == DT_REG)
-        return visit(path);
+        return visit(std::move(path));
     if (entry.type == DT_DIR)
         return walk(path);
     if (entry.type != DT_LNK && entry.type != DT_UNKNOWN)
         return true;
     struct stat status = {}, link = {};
     if (::lstat(path.c_str(), &link) != 0 || ::stat(path.c_str(), &status) != 0)
-        return visit(path); // whoever opens it will find out, and knows whether it matters
+        return visit(std::move(path)); // whoever opens it will find out, and knows whether it matters
     if (S_ISDIR(status.st_mode))
         return (S_ISLNK(link.st_mode) && leadsInside(path)) || walk(path);
-    return !S_ISREG(status.st_mode) || visit(path);
+    return !S_ISREG(status.st_mode) || visit(std::move(path));
 }
 
 bool FolderWalk::isNew(const std::string& folder)

@@ -32,8 +32,8 @@ private:
     };
 
     bool walk(const std::string& folder);
-    bool visitEntry(const std::string& path, const Entry& entry);
-    bool visit(const std::string& path, const std::string& problem = {}) const;
+    bool visitEntry(std::string path, const Entry& entry);
+    bool visit(std::string path, std::string problem = {}) const;
     bool isNew(const std::string& folder);
     bool leadsInside(const std::string& link) const;
     static std::vector<Entry> entriesOf(const std::string& folder, int& error);

@@ -9,7 +9,6 @@
 
 #include <algorithm>
 #include <cmath>
-#include <cstring>
 
 namespace {
 
@@ -143,8 +142,8 @@ std::string text(const LoopTags& tags)
 struct ShownTag {
     const char* name;
     const char* label;
-    std::string (*text)(const LoopTags& tags);
-    std::string (*brief)(const LoopTags& tags) = nullptr; // null: the same
+    TagText text;
+    TagText brief = nullptr; // null: the same
 };
 const ShownTag kShownTags[] = {
     {"tempo", "Tempo", tempoText},
@@ -288,11 +287,9 @@ std::vector<TagLine> tagLines(const LoopTags& tags)
     return lines;
 }
 
-std::string tagText(const LoopTags& tags, const char* name)
+TagText tagTextCalled(std::string_view name)
 {
-    const auto shown = std::find_if(std::begin(kShownTags), std::end(kShownTags),
-                                    [&](const ShownTag& each) { return std::strcmp(each.name, name) == 0; });
-    return shown->text(tags);
+    return std::ranges::find_if(kShownTags, [&](const ShownTag& each) { return each.name == name; })->text;
 }
 
 bool isAbsent(const platform::Value& value)

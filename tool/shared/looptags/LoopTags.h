@@ -73,8 +73,9 @@ struct TagLine {
 };
 /// What is known of the tags, in a musician's order.
 std::vector<TagLine> tagLines(const LoopTags& tags);
-/// The text of one tag by its name, which must be one of theirs, in one line.
-std::string tagText(const LoopTags& tags, const char* name);
+using TagText = std::string (*)(const LoopTags& tags);
+/// What gives the text of one tag, in one line, by its name, which must be one of theirs.
+TagText tagTextCalled(std::string_view name);
 
 /// The root note by its name, in whatever octave, and the mode.
 std::string keyWords(const LoopTags& tags);

@@ -13,7 +13,8 @@ namespace {
 
 bool isUTF8(std::string_view text)
 {
-    return !platform::String::fromUTF8(text).isNull();
+    const bool isASCII = std::ranges::all_of(text, [](char c) { return static_cast<signed char>(c) >= 0; });
+    return isASCII || !platform::String::fromUTF8(text).isNull(); // most are the first, which is told without a copy
 }
 
 bool isThere(const std::string& path)

@@ -6,6 +6,7 @@
 
 #include <algorithm>
 #include <array>
+#include <bit>
 #include <cstddef>
 #include <limits>
 #include <memory>
@@ -120,7 +121,8 @@ std::int32_t CAuFileIO::WriteData(const void* data, long startFrame, long frames
         __builtin_mul_overflow(sampleSize * channels, frames, &size) || size > kMaxPackets ||
         __builtin_mul_overflow(sampleSize * channels, startFrame, &start))
         return kStatusParameterError;
-    if (Swapped()) // the caller's samples stay swapped: callers of old count on it
+    constexpr bool hostIsBig = std::endian::native == std::endian::big;
+    if (Swapped() != hostIsBig) // the caller's samples stay swapped: callers of old count on it
         platform::swapSamples(const_cast<void*>(data), static_cast<int>(sampleSize),
                               static_cast<std::size_t>(frames) * channels);
     if (!file_)

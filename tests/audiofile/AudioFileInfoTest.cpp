@@ -201,7 +201,7 @@ TEST(AudioFileInfo, DescribesCAFData)
     EXPECT_EQ(info.frames, 6);
     EXPECT_EQ(info.dataOffset, 68);
     EXPECT_EQ(with(caf({0, 0, 0, 2, 24})).frames, 8);
-    EXPECT_TRUE(with(caf({1, 8, 1, 1, 64})).byteSwapped);
+    EXPECT_EQ(with(caf({1, 8, 1, 1, 64})).byteSwapped, std::endian::native == std::endian::little);
     EXPECT_EQ(with(caf({2, 4, 1, 2, 16}), -1).frames, 12);
     EXPECT_EQ(with(caf({2, 4, 1, 2, 16}), INT64_MAX).frames, 12);
     for (const double rate : {std::nan(""), std::numeric_limits<double>::infinity(), -1.0, 1e300, 1e-310})

@@ -223,7 +223,8 @@ TEST(CAuFileIO, DataIsWrittenInTheFilesOrderAndLeftInIt)
         ASSERT_EQ(file.CreateAndOpen(refOf(path).URL(), 0, 2, 16, 48000, type, nullptr), 0);
         std::int16_t data[4] = {0x0102, 0x0304, 0x0506, 0x0708};
         ASSERT_EQ(file.WriteData(data, 0, 2), 0);
-        EXPECT_EQ(data[0], type == fourCC("WAVE") ? 0x0102 : 0x0201);
+        const auto order = type == fourCC("WAVE") ? std::endian::little : std::endian::big;
+        EXPECT_EQ(data[0], order == std::endian::native ? 0x0102 : 0x0201);
         std::int16_t more[2] = {0x1112, 0x1314};
         ASSERT_EQ(file.WriteData(more, 1, 1), 0);
         float samples[4];

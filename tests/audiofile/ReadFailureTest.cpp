@@ -2,6 +2,7 @@
 #include "audiofile/CAudioFileIO.h"
 #include "audiofile/ChunkUtilities.h"
 
+#include "platform/core/Packed.h"
 #include "support/ContainerBuilder.h"
 #include "support/FaultInjection.h"
 #include "support/QuietLog.h"
@@ -9,7 +10,7 @@
 
 #include <gtest/gtest.h>
 
-#include <cstring>
+#include <string>
 
 namespace {
 
@@ -25,10 +26,8 @@ Bytes image(std::string_view container)
     builder.chunk("note", 3000).chunk("LIST", 3000).chunk("note", 3000).chunk("last", 3000);
     Bytes bytes = builder.bytes(container == "RF64" ? std::optional<std::uint32_t>(0xFFFFFFFF) : std::nullopt);
     if (container == "RF64") {
-        const std::uint64_t size = bytes.size() - 8;
-        std::memcpy(bytes.data() + 20, &size, sizeof size);
-        const std::uint64_t dataSize = 20008;
-        std::memcpy(bytes.data() + 28, &dataSize, sizeof dataSize);
+        storeLE(bytes.data() + 20, std::uint64_t{bytes.size() - 8});
+        storeLE(bytes.data() + 28, std::uint64_t{20008});
     }
     return bytes;
 }

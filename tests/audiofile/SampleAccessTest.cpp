@@ -2,6 +2,7 @@
 #include "audiofile/CAudioFileIO.h"
 
 #include "SoundFile.h"
+#include "platform/core/ByteWriter.h"
 #include "support/FaultInjection.h"
 #include "support/Media.h"
 #include "support/Programs.h"
@@ -51,7 +52,10 @@ void expectTestSamples(const std::string& path)
 bool writeRaw(const TemporaryFolder& folder, const char* programs)
 {
     const std::vector<float> samples = testSamples();
-    folder.write("base.f32", std::as_bytes(std::span(samples)));
+    ByteWriter raw(std::endian::little);
+    for (const float sample : samples)
+        raw.write(sample);
+    folder.write("base.f32", raw.view());
     return runs(folder, std::string("for p in ") + programs + "; do command -v $p || exit 1; done");
 }
 

@@ -7,7 +7,7 @@
 
 namespace {
 
-constexpr platform::SampleFormat kFloats{32, true, false, std::endian::little};
+constexpr platform::SampleFormat kFloats{32, true, false, std::endian::native};
 
 TEST(AudioRepresentation, NothingComesOfWhatIsNoOverview)
 {

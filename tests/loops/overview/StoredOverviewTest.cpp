@@ -1,6 +1,7 @@
 #include "loops/overview/StoredOverview.h"
 
 #include "OverviewImages.h"
+#include "platform/core/Packed.h"
 #include "support/FaultInjection.h"
 #include "support/TemporaryFolder.h"
 
@@ -43,6 +44,14 @@ Bytes caf(std::initializer_list<StoredChunk> chunks = {}, std::optional<std::int
     return withChunks(ContainerBuilder("caff").format().chunk("data", data, dataSize), chunks);
 }
 
+/// A block, whose header is in the host's order, as it stands in a WAVE file.
+std::string inWave(const KTMem& block)
+{
+    Bytes bytes = bytesOf(block);
+    storeLE(bytes.data(), OverviewFrames(block));
+    return toHex(bytes);
+}
+
 class StoredOverview : public testing::Test {
 protected:
     CFileRef fileOf(BytesView image) { return CFileRef(folder_.write("file", image).c_str(), false); }
@@ -57,7 +66,7 @@ protected:
         std::int32_t status = 1;
         const auto block = ReadOverviewFromAudioFile(ref, frames, &status);
         EXPECT_TRUE(block == nullptr || (IsOverviewBlock(*block) && status == kStatusOK));
-        return block ? toHex(bytesOf(*block)) : std::to_string(status);
+        return block ? inWave(*block) : std::to_string(status);
     }
     /// "stored" or the status; where it was not stored without an error, "0".
     std::string write(const CFileRef& ref, KTMem* overview, long frames = 0)
@@ -92,7 +101,7 @@ TEST_F(StoredOverview, IsStoredByteForByte)
         for (int round = 0; round < 2; ++round) { // the second takes the place of the first
             EXPECT_EQ(write(ref, &overview_), "stored");
             EXPECT_EQ(chunkOf(ref, id), fromHex(body));
-            EXPECT_EQ(read(ref), toHex(bytesOf(overview_)));
+            EXPECT_EQ(read(ref), inWave(overview_));
             const Bytes written = readFile(ref.GetPath());
             EXPECT_EQ(written.size(), image.size() + (id == "ovvw" ? 12 + 16 : 8 + 12));
             EXPECT_TRUE(std::equal(image.begin() + 12, image.end(), written.begin() + 12));
@@ -225,7 +234,7 @@ TEST_F(StoredOverview, StrayBytesAtTheEndNeitherHideItNorBecomeSamples)
         image.insert(image.end(), bytesOf(behind).begin(), bytesOf(behind).end());
         return image;
     };
-    const std::string block = toHex(bytesOf(overview_));
+    const std::string block = inWave(overview_);
     const Bytes cleanWave = wave(), cleanCaf = caf();
     for (const Bytes& image : {with(cleanWave, "1234567"), with(aiff(), "1"), with(cleanCaf, std::string_view("\0", 1)),
                                with(cleanCaf, "12345678901")}) {
@@ -261,7 +270,7 @@ TEST_F(StoredOverview, TheOldOneStaysUntilTheNewOneStands)
 // The status is that of the chunk layer, and the file is closed each time.
 TEST_F(StoredOverview, FailuresOfTheDiskAreReported)
 {
-    const std::string block = toHex(bytesOf(overview_));
+    const std::string block = inWave(overview_);
     for (const Bytes& image : {wave(), aiff(), caf()}) {
         const CFileRef ref = fileOf(image);
         FaultInjector faults;

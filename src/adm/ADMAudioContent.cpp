@@ -55,3 +55,8 @@ void ADMAudioContent::resolveIDRefsWithResolver(ADMElementResolver& resolver)
 {
     audioObjects_.resolve(resolver, kADMAudioObjectPrefix);
 }
+
+void ADMAudioContent::announceIDRefsToResolver(ADMElementResolver& resolver) const
+{
+    audioObjects_.announce(resolver, kADMAudioObjectPrefix);
+}

@@ -53,6 +53,7 @@ public:
     void addSubElement_audioContentLabel(std::string_view value, const platform::XMLAttributes& attributes);
     void addSubElement_dialogue(std::string_view value, const platform::XMLAttributes& attributes);
     void resolveIDRefsWithResolver(ADMElementResolver& resolver) override;
+    void announceIDRefsToResolver(ADMElementResolver& resolver) const override;
 
 private:
     std::string audioContentID_;

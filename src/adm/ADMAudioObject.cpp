@@ -111,6 +111,13 @@ void ADMAudioObject::resolveIDRefsWithResolver(ADMElementResolver& resolver)
     audioTrackUIDs_.resolve(resolver, kADMAudioTrackUIDPrefix);
 }
 
+void ADMAudioObject::announceIDRefsToResolver(ADMElementResolver& resolver) const
+{
+    audioPackFormats_.announce(resolver, kADMAudioPackFormatPrefix);
+    audioObjects_.announce(resolver, kADMAudioObjectPrefix);
+    audioTrackUIDs_.announce(resolver, kADMAudioTrackUIDPrefix);
+}
+
 std::string ADMAudioObject::description() const
 {
     return "<AudioObject: " + adm::addressText(this) + ", ID: " + audioObjectID_ + ", Name: " + audioObjectName_ +

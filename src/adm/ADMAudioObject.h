@@ -98,6 +98,7 @@ public:
     void addSubElement_mute(std::string_view value, const platform::XMLAttributes& attributes);
     void addSubElement_positionOffset(std::string_view value, const platform::XMLAttributes& attributes);
     void resolveIDRefsWithResolver(ADMElementResolver& resolver) override;
+    void announceIDRefsToResolver(ADMElementResolver& resolver) const override;
     void readExactTimes(const platform::XMLAttributes& attributes) override;
     std::string description() const override;
 

@@ -52,6 +52,12 @@ void ADMAudioPackFormat::resolveIDRefsWithResolver(ADMElementResolver& resolver)
     audioPackFormats_.resolve(resolver, kADMAudioPackFormatPrefix);
 }
 
+void ADMAudioPackFormat::announceIDRefsToResolver(ADMElementResolver& resolver) const
+{
+    audioChannelFormats_.announce(resolver, kADMAudioChannelFormatPrefix);
+    audioPackFormats_.announce(resolver, kADMAudioPackFormatPrefix);
+}
+
 std::string ADMAudioPackFormat::description() const
 {
     // Kept: the class is not called by its whole name.

@@ -57,3 +57,8 @@ void ADMAudioProgramme::resolveIDRefsWithResolver(ADMElementResolver& resolver)
 {
     audioContents_.resolve(resolver, kADMAudioContentPrefix);
 }
+
+void ADMAudioProgramme::announceIDRefsToResolver(ADMElementResolver& resolver) const
+{
+    audioContents_.announce(resolver, kADMAudioContentPrefix);
+}

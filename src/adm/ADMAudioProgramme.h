@@ -52,6 +52,7 @@ public:
     void addSubElement_audioContentIDRef(std::string_view value, const platform::XMLAttributes& attributes);
     void addSubElement_audioProgrammeLabel(std::string_view value, const platform::XMLAttributes& attributes);
     void resolveIDRefsWithResolver(ADMElementResolver& resolver) override;
+    void announceIDRefsToResolver(ADMElementResolver& resolver) const override;
     void readExactTimes(const platform::XMLAttributes& attributes) override;
 
 private:

@@ -60,6 +60,13 @@ void ADMAudioStreamFormat::resolveIDRefsWithResolver(ADMElementResolver& resolve
     audioTrackFormats_.resolve(resolver, kADMAudioTrackFormatPrefix);
 }
 
+void ADMAudioStreamFormat::announceIDRefsToResolver(ADMElementResolver& resolver) const
+{
+    audioChannelFormat_.announce(resolver, kADMAudioChannelFormatPrefix);
+    audioPackFormat_.announce(resolver, kADMAudioPackFormatPrefix);
+    audioTrackFormats_.announce(resolver, kADMAudioTrackFormatPrefix);
+}
+
 std::string ADMAudioStreamFormat::description() const
 {
     return "<AudioStreamFormat: " + adm::addressText(this) + ", ID: " + audioStreamFormatID_ +

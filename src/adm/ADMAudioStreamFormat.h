@@ -54,6 +54,7 @@ public:
     void addSubElement_audioPackFormatIDRef(std::string_view value, const platform::XMLAttributes& attributes);
     void addSubElement_audioTrackFormatIDRef(std::string_view value, const platform::XMLAttributes& attributes);
     void resolveIDRefsWithResolver(ADMElementResolver& resolver) override;
+    void announceIDRefsToResolver(ADMElementResolver& resolver) const override;
     std::string description() const override;
 
 private:

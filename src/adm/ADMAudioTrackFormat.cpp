@@ -44,3 +44,8 @@ void ADMAudioTrackFormat::resolveIDRefsWithResolver(ADMElementResolver& resolver
 {
     audioStreamFormat_.resolve(resolver, kADMAudioStreamFormatPrefix);
 }
+
+void ADMAudioTrackFormat::announceIDRefsToResolver(ADMElementResolver& resolver) const
+{
+    audioStreamFormat_.announce(resolver, kADMAudioStreamFormatPrefix);
+}

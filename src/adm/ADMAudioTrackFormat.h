@@ -43,6 +43,7 @@ public:
                        const platform::XMLAttributes& attributes) override;
     void addSubElement_audioStreamFormatIDRef(std::string_view value, const platform::XMLAttributes& attributes);
     void resolveIDRefsWithResolver(ADMElementResolver& resolver) override;
+    void announceIDRefsToResolver(ADMElementResolver& resolver) const override;
 
 private:
     std::string audioTrackFormatID_;

@@ -56,6 +56,13 @@ void ADMAudioTrackUID::resolveIDRefsWithResolver(ADMElementResolver& resolver)
     audioPackFormat_.resolve(resolver, kADMAudioPackFormatPrefix);
 }
 
+void ADMAudioTrackUID::announceIDRefsToResolver(ADMElementResolver& resolver) const
+{
+    audioTrackFormat_.announce(resolver, kADMAudioTrackFormatPrefix);
+    audioChannelFormat_.announce(resolver, kADMAudioChannelFormatPrefix);
+    audioPackFormat_.announce(resolver, kADMAudioPackFormatPrefix);
+}
+
 std::string ADMAudioTrackUID::description() const
 {
     return "<ADMAudioTrackUID: " + adm::addressText(this) + ", ID: " + audioTrackUIDID_ +

@@ -52,6 +52,7 @@ public:
     void addSubElement_audioChannelFormatIDRef(std::string_view value, const platform::XMLAttributes& attributes);
     void addSubElement_audioPackFormatIDRef(std::string_view value, const platform::XMLAttributes& attributes);
     void resolveIDRefsWithResolver(ADMElementResolver& resolver) override;
+    void announceIDRefsToResolver(ADMElementResolver& resolver) const override;
     std::string description() const override;
 
 private:

@@ -3,6 +3,8 @@
 #include "adm/ADMIdentifier.h"
 #include "platform/Log.h"
 
+#include <algorithm>
+
 std::unique_ptr<ADMDocument> ADMDocument::initWithADMData(std::optional<Bytes> data)
 {
     if (!data) {
@@ -81,28 +83,41 @@ ADMElement* ADMDocument::findADMElementRef(std::optional<std::string_view> ident
                        "'" + std::string(*identifier) + "' referenced, but not defined");
 }
 
-ADMElement* ADMDocument::find(std::string_view identifier, std::string_view prefix) const
+/// What `work` gives for the table of the kind that has this prefix; null, or nothing, when there is none.
+template <class Document, class Work>
+auto ADMDocument::withTableOf(Document& document, std::string_view prefix, Work work)
 {
+    using Result = decltype(work(document.audioObjects_));
     switch (adm::packedPrefix(prefix)) {
     case adm::packedPrefix(kADMAudioTrackUIDPrefix):
-        return audioTrackUIDs_.find(identifier);
+        return work(document.audioTrackUIDs_);
     case adm::packedPrefix(kADMAudioTrackFormatPrefix):
-        return audioTrackFormats_.find(identifier);
+        return work(document.audioTrackFormats_);
     case adm::packedPrefix(kADMAudioStreamFormatPrefix):
-        return audioStreamFormats_.find(identifier);
+        return work(document.audioStreamFormats_);
     case adm::packedPrefix(kADMAudioChannelFormatPrefix):
-        return audioChannelFormats_.find(identifier);
+        return work(document.audioChannelFormats_);
     case adm::packedPrefix(kADMAudioPackFormatPrefix):
-        return audioPackFormats_.find(identifier);
+        return work(document.audioPackFormats_);
     case adm::packedPrefix(kADMAudioObjectPrefix):
-        return audioObjects_.find(identifier);
+        return work(document.audioObjects_);
     case adm::packedPrefix(kADMAudioContentPrefix):
-        return audioContents_.find(identifier);
+        return work(document.audioContents_);
     case adm::packedPrefix(kADMAudioProgrammePrefix):
-        return audioProgrammes_.find(identifier);
+        return work(document.audioProgrammes_);
     default:
-        return nullptr;
+        return Result();
     }
+}
+
+ADMElement* ADMDocument::find(std::string_view identifier, std::string_view prefix) const
+{
+    return withTableOf(*this, prefix, [&](const auto& table) -> ADMElement* { return table.find(identifier); });
+}
+
+void ADMDocument::expectADMElementRef(std::string_view identifier, std::string_view typePrefix)
+{
+    withTableOf(*this, typePrefix, [&](auto& table) { table.prefetch(identifier); });
 }
 
 /// Finds for one element after the other; knows which, so that a problem can be told with its place.
@@ -126,6 +141,11 @@ public:
         }
     }
 
+    void expectADMElementRef(std::string_view identifier, std::string_view typePrefix) override
+    {
+        document_.expectADMElementRef(identifier, typePrefix);
+    }
+
 private:
     ADMDocument& document_;
     const ADMElement* element_ = nullptr;
@@ -134,7 +154,12 @@ private:
 template <class Table>
 void ADMDocument::resolve(const Table& table, LinkFinder& finder)
 {
+    auto ahead = table.begin();
+    for (std::size_t i = 0; i < std::min(adm::kAnnounced, table.size()); ++i)
+        (ahead++)->announceIDRefsToResolver(finder);
     for (ADMElement& element : table) {
+        if (ahead != table.end())
+            (ahead++)->announceIDRefsToResolver(finder);
         finder.setElement(element);
         element.resolveIDRefsWithResolver(finder);
     }

@@ -72,6 +72,7 @@ public:
     /// Null for no ID and for an empty prefix.
     ADMElement* findADMElementRef(std::optional<std::string_view> identifier,
                                   std::optional<std::string_view> typePrefix = {}) override;
+    void expectADMElementRef(std::string_view identifier, std::string_view typePrefix) override;
 
     platform::InputStream* inputStream() const { return inputStream_.get(); }
     /// Null unless a parse runs.
@@ -106,6 +107,8 @@ private:
     void forgetOpenElements();
 
     ADMElement* find(std::string_view identifier, std::string_view prefix) const;
+    template <class Document, class Work>
+    static auto withTableOf(Document& document, std::string_view prefix, Work work);
     template <class Table>
     void resolve(const Table& table, LinkFinder& finder);
     void report(const ADMException& problem, std::string elementID, platform::XMLPosition position) const;

@@ -14,6 +14,14 @@ void ADMElement::resolveIDRefsWithResolver(ADMElementResolver&)
 {
 }
 
+void ADMElementResolver::expectADMElementRef(std::string_view, std::string_view)
+{
+}
+
+void ADMElement::announceIDRefsToResolver(ADMElementResolver&) const
+{
+}
+
 void ADMElement::readExactTimes(const platform::XMLAttributes&)
 {
 }

@@ -19,6 +19,8 @@ public:
     /// MissingDefinition.
     virtual ADMElement* findADMElementRef(std::optional<std::string_view> identifier,
                                           std::optional<std::string_view> typePrefix = {}) = 0;
+    /// That the ID will be looked for soon: time to ask memory for what lies where it would be found.
+    virtual void expectADMElementRef(std::string_view identifier, std::string_view typePrefix);
 };
 
 /// Element links are non-owning: the document owns every element, and links are valid as long as it lives.
@@ -38,6 +40,8 @@ public:
                                const platform::XMLAttributes& attributes);
     /// `resolveIDRefsWithResolver:`. To be called once: a second call appends the same links again.
     virtual void resolveIDRefsWithResolver(ADMElementResolver& resolver);
+    /// Tells the resolver some of the IDs that resolving will begin with.
+    virtual void announceIDRefsToResolver(ADMElementResolver& resolver) const;
     /// Reads the timestamps among the attributes a second time, as decimals, for the accessors that begin with "exact".
     virtual void readExactTimes(const platform::XMLAttributes& attributes);
     /// A text for debugging.

@@ -30,11 +30,24 @@ public:
     /// The element stored under `id`, spelt exactly so; null when there is none.
     Element* find(std::string_view id) const
     {
-        if (id.size() <= kShortID && !slots_.empty())
-            if (const std::size_t at = slotOf(id); at != kNoSlot && slots_[at].element != nullptr)
-                return slots_[at].element;
+        if (id.size() <= kShortID && !lines_.empty())
+            if (const std::size_t at = slotOf(id); at != kNoSlot && slotAt(at).element != nullptr)
+                return slotAt(at).element;
         const auto found = others_.find(id);
         return found == others_.end() ? nullptr : elements_[found->second].get();
+    }
+
+    /// Asks memory for the slot that find() will look at first, and for the element that stands in the slot that was
+    /// asked for eight IDs ahead, which is there by now.
+    void prefetch(std::string_view id)
+    {
+        if (id.size() > kShortID || lines_.empty())
+            return;
+        const Slot*& expected = expected_[nextExpected_++ % expected_.size()];
+        if (expected != nullptr)
+            __builtin_prefetch(expected->element);
+        expected = &slotAt(firstSlotOf(id) & (slotCount() - 1));
+        __builtin_prefetch(expected);
     }
 
     /// One that is already there under this ID is replaced, and the new one takes its place in the order. It lives on
@@ -43,12 +56,12 @@ public:
     {
         if (elements_.size() == std::numeric_limits<std::uint32_t>::max())
             throw std::bad_alloc();
-        if (id.size() <= kShortID && slots_.size() < 2 * (elements_.size() + 1))
+        if (id.size() <= kShortID && slotCount() < 2 * (elements_.size() + 1))
             grow();
         const std::size_t at = id.size() <= kShortID ? slotOf(id) : kNoSlot;
-        if (at != kNoSlot && slots_[at].element != nullptr) {
-            slots_[at].element = element.get();
-            replace(slots_[at].entry, std::move(element));
+        if (at != kNoSlot && slotAt(at).element != nullptr) {
+            slotAt(at).element = element.get();
+            replace(slotAt(at).entry, std::move(element));
             return;
         }
         if (const auto other = others_.find(id); other != others_.end()) {
@@ -119,15 +132,25 @@ private:
         std::uint32_t entry = 0;    // where it stands in the order
         Element* element = nullptr; // null: the slot is free
     };
-    static_assert(sizeof(Slot) == 32);
+    /// Of the cache: who looks into one of the slots has the other.
+    struct alignas(64) Line {
+        std::array<Slot, 2> slots;
+    };
+    static_assert(sizeof(Slot) == 32 && sizeof(Line) == 64);
 
+    std::size_t slotCount() const { return 2 * lines_.size(); }
+    Slot& slotAt(std::size_t at) { return lines_[at / 2].slots[at % 2]; }
+    const Slot& slotAt(std::size_t at) const { return lines_[at / 2].slots[at % 2]; }
+
+    /// The first of a line, to be masked.
+    static std::size_t firstSlotOf(std::string_view id) { return std::hash<std::string_view>()(id) & ~std::size_t{1}; }
     /// The slot that holds this ID, or the free one where it belongs; `kNoSlot` when others have all within reach.
     std::size_t slotOf(std::string_view id) const
     {
-        const std::size_t mask = slots_.size() - 1;
-        const std::size_t first = std::hash<std::string_view>()(id);
+        const std::size_t mask = slotCount() - 1;
+        const std::size_t first = firstSlotOf(id);
         for (std::size_t i = 0; i < kReach; ++i)
-            if (const Slot& slot = slots_[(first + i) & mask]; slot.element == nullptr || slot.holds(id))
+            if (const Slot& slot = slotAt((first + i) & mask); slot.element == nullptr || slot.holds(id))
                 return (first + i) & mask;
         return kNoSlot;
     }
@@ -136,7 +159,7 @@ private:
         if (slot == kNoSlot)
             others_.emplace(id, entry);
         else
-            slots_[slot] = Slot(id, entry, elements_[entry].get());
+            slotAt(slot) = Slot(id, entry, elements_[entry].get());
     }
     void replace(std::uint32_t entry, std::unique_ptr<Element> element)
     {
@@ -144,15 +167,19 @@ private:
     }
     void grow()
     {
-        const std::vector<Slot> before =
-            std::exchange(slots_, std::vector<Slot>(std::max<std::size_t>(16, 2 * slots_.size())));
-        for (const Slot& slot : before)
-            if (slot.element != nullptr)
-                place(slot.text(), slotOf(slot.text()), slot.entry);
+        expected_ = {};
+        const std::vector<Line> before =
+            std::exchange(lines_, std::vector<Line>(std::max<std::size_t>(8, 2 * lines_.size())));
+        for (const Line& line : before)
+            for (const Slot& slot : line.slots)
+                if (slot.element != nullptr)
+                    place(slot.text(), slotOf(slot.text()), slot.entry);
     }
 
     Owners elements_;
-    std::vector<Slot> slots_;                                  // a power of two, at most half of them taken
+    std::vector<Line> lines_;               // a power of two, at most half of their slots taken
+    std::array<const Slot*, 8> expected_{}; // by prefetch(), null until then
+    std::size_t nextExpected_ = 0;
     std::map<std::string, std::uint32_t, std::less<>> others_; // long IDs, and those that found no slot
     Owners replaced_;
 };

@@ -3,12 +3,21 @@
 
 #include "adm/ADMElement.h"
 
+#include <algorithm>
+#include <cstddef>
 #include <memory>
 #include <optional>
 #include <string>
 #include <string_view>
 #include <utility>
 #include <vector>
+
+namespace adm {
+
+/// So many look-ups ahead of one it is told what will be looked for: each waits for memory otherwise.
+inline constexpr std::size_t kAnnounced = 16;
+
+} // namespace adm
 
 /// Any number of them, in the order of the document.
 template <class Element>
@@ -18,8 +27,18 @@ struct ADMReferenceList {
 
     void resolve(ADMElementResolver& resolver, std::string_view prefix)
     {
-        for (const std::string& id : ids)
-            elements.push_back(dynamic_cast<Element*>(resolver.findADMElementRef(id, prefix)));
+        elements.reserve(elements.size() + ids.size());
+        for (std::size_t i = 0; i < ids.size(); ++i) {
+            if (i + adm::kAnnounced < ids.size())
+                resolver.expectADMElementRef(ids[i + adm::kAnnounced], prefix);
+            elements.push_back(dynamic_cast<Element*>(resolver.findADMElementRef(ids[i], prefix)));
+        }
+    }
+    /// What resolve() does not tell of itself.
+    void announce(ADMElementResolver& resolver, std::string_view prefix) const
+    {
+        for (std::size_t i = 0; i < std::min(adm::kAnnounced, ids.size()); ++i)
+            resolver.expectADMElementRef(ids[i], prefix);
     }
 };
 
@@ -32,6 +51,11 @@ struct ADMReference {
     void resolve(ADMElementResolver& resolver, std::string_view prefix)
     {
         element = dynamic_cast<Element*>(resolver.findADMElementRef(id, prefix));
+    }
+    void announce(ADMElementResolver& resolver, std::string_view prefix) const
+    {
+        if (id)
+            resolver.expectADMElementRef(*id, prefix);
     }
 };
 

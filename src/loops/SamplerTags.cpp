@@ -48,17 +48,17 @@ std::span<const FourCC> idsIn(FourCC fileType)
     return fileType == fourCC("AIFF") || fileType == fourCC("AIFC") ? std::span(kAIFFIDs) : std::span<const FourCC>();
 }
 
-std::string inUTF8(const std::string& bytes, bool isAIFF)
+std::string inUTF8(std::string_view bytes, bool isAIFF)
 {
     using platform::FallbackEncoding;
     return platform::decodeFileText(bytes, isAIFF ? FallbackEncoding::macintosh : FallbackEncoding::latin1).utf8;
 }
 
-std::string trimmed(const std::string& text)
+std::string_view trimmed(std::string_view text)
 {
     constexpr const char* kWhite = " \t\r\n\v\f";
     const std::size_t start = text.find_first_not_of(kWhite);
-    return start == std::string::npos ? "" : text.substr(start, text.find_last_not_of(kWhite) + 1 - start);
+    return start == text.npos ? std::string_view() : text.substr(start, text.find_last_not_of(kWhite) + 1 - start);
 }
 
 template <class T, class From>
@@ -173,7 +173,7 @@ private:
         }
     }
 
-    void addTempo(const std::string& text)
+    void addTempo(std::string_view text)
     {
         double tempo = 0;
         const auto result = std::from_chars(text.data(), text.data() + text.size(), tempo);
@@ -181,13 +181,15 @@ private:
             setFirst(tags_.tempo, tempo, InfoList::kForm);
     }
 
-    void addText(std::span<const TextID> ids, FourCC id, const std::string& bytes, FourCC source, bool isAIFF)
+    void addText(std::span<const TextID> ids, FourCC id, std::string_view bytes, FourCC source, bool isAIFF)
     {
         const auto known = std::ranges::find(ids, id, &TextID::id);
-        const std::string text = trimmed(inUTF8(bytes, isAIFF));
-        if (known != ids.end() && !text.empty() &&
-            std::ranges::find(tags_.texts, known->kind, &SamplerTags::Text::kind) == tags_.texts.end())
-            tags_.texts.push_back({known->kind, text, source});
+        if (known == ids.end() || bytes.empty())
+            return;
+        const std::string decoded = inUTF8(bytes, isAIFF);
+        const std::string_view text = trimmed(decoded);
+        if (!text.empty() && std::ranges::find(tags_.texts, known->kind, &SamplerTags::Text::kind) == tags_.texts.end())
+            tags_.texts.push_back({known->kind, std::string(text), source});
     }
 
     // Points that "adtl" names; looked up by maps, for there may be millions.

@@ -65,12 +65,17 @@ void readBasicTagging(BytesView bytes, Dictionary& tags)
     BasicTaggingChunk basic;
     std::memcpy(&basic, bytes.data(), sizeof basic);
     tagging::SwapBasicTaggingChunkToHost(&basic);
-    tags[VireoLoopCombinedTagsChunkDataBeatCountKey] = std::int32_t{basic.beatCount};
-    tags[VireoLoopCombinedTagsChunkDataMidiRootNoteKey] = std::int16_t{basic.midiRootNote};
-    tags[VireoLoopCombinedTagsChunkDataKeyType] = std::int16_t{basic.keyType};
-    tags[VireoLoopCombinedTagsChunkDataSignatureTopKey] = std::int16_t{basic.signatureTop};
-    tags[VireoLoopCombinedTagsChunkDataSignatureBottomKey] = std::int16_t{basic.signatureBottom};
-    tags[VireoLoopCombinedTagsChunkDataFileTypeKey] = std::int16_t{basic.fileType};
+    const std::pair<const char*, std::int64_t> numbers[] = {
+        // in the order of the dictionary, each behind the others
+        {VireoLoopCombinedTagsChunkDataBeatCountKey, basic.beatCount},
+        {VireoLoopCombinedTagsChunkDataFileTypeKey, basic.fileType},
+        {VireoLoopCombinedTagsChunkDataKeyType, basic.keyType},
+        {VireoLoopCombinedTagsChunkDataMidiRootNoteKey, basic.midiRootNote},
+        {VireoLoopCombinedTagsChunkDataSignatureBottomKey, basic.signatureBottom},
+        {VireoLoopCombinedTagsChunkDataSignatureTopKey, basic.signatureTop},
+    };
+    for (const auto& [key, number] : numbers)
+        tags.emplace_hint(tags.end(), key, number);
 }
 
 /// The descriptors that the bytes hold, at most `claimed`; one that is not UTF-8 is skipped.
@@ -114,11 +119,12 @@ void readCategories(BytesView bytes, Dictionary& tags)
     };
     for (const auto& [key, offset] : texts)
         if (std::string text = fieldTextOrNothing(bytes.data() + offset); !text.empty())
-            tags[key] = std::move(text);
+            tags.emplace(key, std::move(text));
     if (bytes.size() < descriptorsOffset)
         return;
     if (const auto count = loadBE<std::uint16_t>(bytes.data() + countOffset); count != 0)
-        tags[VireoLoopCombinedTagsChunkDataDescriptorsKey] = descriptorsIn(bytes.subspan(descriptorsOffset), count);
+        tags.emplace(VireoLoopCombinedTagsChunkDataDescriptorsKey,
+                     descriptorsIn(bytes.subspan(descriptorsOffset), count));
 }
 
 BasicTaggingChunk basicTaggingOf(const Dictionary& tags)

@@ -3,6 +3,7 @@
 #include "platform/core/HashSlots.h"
 
 #include <algorithm>
+#include <array>
 #include <cstring>
 #include <functional>
 
@@ -36,9 +37,29 @@ const ProjectFileSet::Slot* ProjectFileSet::find(std::string_view path, std::uin
 
 bool ProjectFileSet::insert(std::string_view path)
 {
+    return insert(path, hashOf(path));
+}
+
+void ProjectFileSet::insert(std::span<const std::string> paths)
+{
+    constexpr std::size_t most = 32; // reads that are under way at a time
+    for (; !paths.empty(); paths = paths.subspan(std::min(most, paths.size()))) {
+        const auto some = paths.first(std::min(most, paths.size()));
+        std::array<std::uint32_t, most> hashes;
+        for (std::size_t i = 0; i < some.size(); ++i) {
+            hashes[i] = hashOf(some[i]);
+            if (!slots_.empty())
+                __builtin_prefetch(&slots_[hashes[i] & (slots_.size() - 1)]);
+        }
+        for (std::size_t i = 0; i < some.size(); ++i)
+            insert(some[i], hashes[i]);
+    }
+}
+
+bool ProjectFileSet::insert(std::string_view path, std::uint32_t hash)
+{
     if (2 * (paths_.size() + 1) > slots_.size())
         growHashSlots(slots_);
-    const std::uint32_t hash = hashOf(path);
     const auto at = static_cast<std::size_t>(find(path, hash) - slots_.data());
     if (slots_[at].number != 0)
         return false;

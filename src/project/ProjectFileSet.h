@@ -8,6 +8,8 @@
 #include <cstdint>
 #include <initializer_list>
 #include <memory>
+#include <span>
+#include <string>
 #include <string_view>
 #include <vector>
 
@@ -22,6 +24,9 @@ public:
 
     /// False when the path is there already.
     bool insert(std::string_view path);
+    /// Each in its turn, what the table has of all of them being asked of memory first: a large set waits for it else
+    /// with every path.
+    void insert(std::span<const std::string> paths);
     bool contains(std::string_view path) const;
     std::size_t size() const { return paths_.size(); }
     bool empty() const { return paths_.empty(); }
@@ -38,6 +43,7 @@ private:
     };
 
     const Slot* find(std::string_view path, std::uint32_t hash) const;
+    bool insert(std::string_view path, std::uint32_t hash);
     std::string_view keep(std::string_view path);
 
     std::vector<Slot> slots_; // a power of two, at most half of them taken

@@ -4,6 +4,10 @@
 #include "project/ProjectLayout.h"
 #include "project/ProjectMediaPaths.h"
 
+#include <array>
+#include <span>
+#include <utility>
+
 namespace {
 
 const char* keyOf(ProjectMediaKind kind)
@@ -20,10 +24,15 @@ void ProjectInformation::addFiles(ProjectFileSet& files, ProjectMediaKind kind, 
     if (list == nullptr)
         return;
     const ProjectMediaPaths paths(standardizedPath(pathOf(projectURL_)), hasProjectFolder());
-    std::string path;
-    for (const platform::Value& element : *list)
-        if (const auto* stored = element.get<std::string>(); stored != nullptr && paths.makeAbsolute(*stored, path))
-            files.insert(path);
+    std::array<std::string, 32> made; // their memory is used again and again
+    std::size_t count = 0;
+    for (const platform::Value& element : *list) {
+        const auto* stored = element.get<std::string>();
+        count += stored != nullptr && paths.makeAbsolute(*stored, made[count]);
+        if (count == made.size())
+            files.insert(std::span(made).first(std::exchange(count, 0)));
+    }
+    files.insert(std::span(made).first(count));
 }
 
 std::vector<std::string> ProjectInformation::relativeFilepathsUsedByVariantIndex(ProjectMediaKind kind, long index)

@@ -139,6 +139,42 @@ TEST(ADMElementTable, ManyIDsOfAnyLength)
 }
 
 /// A different one for each number, all of the same hash: the standard library's function run backwards.
+/// Finds nothing, and knows what it was told ahead and what it was asked.
+struct Listener : ADMElementResolver {
+    ADMElement* findADMElementRef(std::optional<std::string_view> id, std::optional<std::string_view> prefix) override
+    {
+        if (id)
+            asked.push_back(std::string(*id) + " " + std::string(*prefix));
+        return nullptr;
+    }
+    void expectADMElementRef(std::string_view id, std::string_view prefix) override
+    {
+        told.push_back(std::string(id) + " " + std::string(prefix));
+    }
+    std::vector<std::string> asked, told;
+};
+
+TEST(ADMElements, EveryReferenceIsAnnouncedOnceAndAskedForInOrder)
+{
+    ADMAudioObject object({{"audioObjectID", "AO_1001"}, {"audioObjectName", "O"}});
+    ADMAudioTrackUID track({{"UID", "ATU_00000001"}});
+    std::vector<std::string> ids, expected{"AP_00031001 AP"};
+    for (int i = 0; i < 30; ++i)
+        expected.push_back(ids.emplace_back("ATU_" + std::to_string(10000000 + i)) + " ATU");
+    object.setAudioPackFormatIDRefs({"AP_00031001"});
+    object.setAudioTrackUIDRefs(ids);
+    track.setAudioPackFormatIDRef("AP_00031002");
+    expected.push_back("AP_00031002 AP");
+    Listener listener;
+    for (ADMElement* element : std::initializer_list<ADMElement*>{&object, &track}) {
+        element->announceIDRefsToResolver(listener);
+        element->resolveIDRefsWithResolver(listener);
+    }
+    EXPECT_EQ(listener.asked, expected);
+    EXPECT_EQ(listener.told, expected);
+    EXPECT_EQ(object.audioTrackUIDs().size(), ids.size());
+}
+
 std::string collidingID(std::uint64_t number)
 {
     const auto text = [](std::uint64_t word) { return std::string(reinterpret_cast<const char*>(&word), sizeof word); };

@@ -55,10 +55,16 @@ TEST(ProjectFileSet, HoldsWhatAStandardSetHolds)
     ProjectFileSet files;
     std::set<std::string> expected;
     std::string large(300'000, 'x'); // more than a block of texts
+    std::vector<std::string> given;
     for (int i = 0; i < 5000; ++i) {
         const std::string path = "/media/" + std::to_string(i * 7919 % 3000);
         EXPECT_EQ(files.insert(path), expected.insert(path).second) << path;
+        given.push_back(path);
     }
+    ProjectFileSet together;
+    for (const std::size_t count : {0u, 1u, 33u, 5000u}) // some of them twice
+        together.insert(std::span(given).first(count));
+    EXPECT_TRUE(std::equal(files.begin(), files.end(), together.begin(), together.end())) << "in the same order";
     EXPECT_FALSE(files.contains("/media/3000"));
     EXPECT_FALSE(files.contains("/media/"));
     EXPECT_FALSE(files.contains(large));

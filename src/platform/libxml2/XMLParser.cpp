@@ -4,6 +4,7 @@
 #include "platform/libxml2/XMLInput.h"
 
 #include <algorithm>
+#include <array>
 #include <exception>
 #include <forward_list>
 #include <new>
@@ -96,9 +97,17 @@ private:
     /// A name as it is written, out of the two parts into which the parser takes it; valid during the event.
     std::string_view written(const xmlChar* prefix, const xmlChar* name)
     {
-        if (prefix == nullptr)
-            return viewOf(name);
+        if (prefix == nullptr) [[likely]]
+            return nameAt(name);
         return ((keptNames_.emplace_front(viewOf(prefix)) += ':') += viewOf(name));
+    }
+    /// The parser keeps one copy of each name to the end: most are as long as when they were met before.
+    std::string_view nameAt(const xmlChar* name)
+    {
+        std::string_view& met = metNames_[reinterpret_cast<std::uintptr_t>(name) / 4 % metNames_.size()];
+        if (met.data() != reinterpret_cast<const char*>(name))
+            met = viewOf(name);
+        return met;
     }
     void fail(std::int64_t code, std::string_view message);
     void stop();
@@ -121,6 +130,7 @@ private:
     XMLHandler& handler_;
     std::vector<XMLAttribute> attributes_;     // of the element that begins
     std::forward_list<std::string> keptNames_; // that had to be joined
+    std::array<std::string_view, 64> metNames_;
     int maximumDepth_ = kXMLMaximumDepth;
     std::vector<int> namespaces_{0}; // in force at each depth, from that of no element on
     std::size_t stretch_ = 0;        // bytes read since the last event
@@ -188,10 +198,12 @@ void XMLParser::Implementation::start(const xmlChar* name, const xmlChar* prefix
     if (stopped_)
         return;
 
-    attributes_.clear();
     keptNames_.clear();
-    for (const xmlChar** row = attributeRows; row != attributeRows + 5 * attributes; row += 5)
-        attributes_.push_back({written(row[1], row[0]), viewOf(row[3], row[4])});
+    attributes_.resize(static_cast<std::size_t>(attributes));
+    for (XMLAttribute& attribute : attributes_) {
+        attribute = {written(attributeRows[1], attributeRows[0]), viewOf(attributeRows[3], attributeRows[4])};
+        attributeRows += 5;
+    }
     for (const xmlChar** pair = namespacePairs; pair != namespacePairs + 2 * namespaces; pair += 2) {
         const auto* xmlns = reinterpret_cast<const xmlChar*>("xmlns");
         attributes_.push_back({pair[0] == nullptr ? viewOf(xmlns) : written(xmlns, pair[0]),
@@ -348,6 +360,7 @@ bool XMLParser::Implementation::parse(Error* error)
 {
     xmlInitParser();
     xmlSAXHandler sax = handlers();
+    metNames_.fill({});
     context_.reset(xmlCreateIOParserCtxt(&sax, this, onRead, nullptr, this, XML_CHAR_ENCODING_NONE));
     if (context_ == nullptr)
         throw std::bad_alloc();

@@ -47,3 +47,26 @@ TEST_F(ExclusionTest, TheTableOfTypesHoldsBetweenProcesses)
             ASSERT_TRUE(comer.gets("b"));
         }
 }
+
+// Each kind of presence has a byte of its own, and a process may have raised several.
+TEST_F(ExclusionTest, OfTwoPresenterLocksOfAProcessEachHoldsItsOwnKindsBack)
+{
+    for (const char* second : {"presenterlock 0", "presenterlock 2"}) {
+        SCOPED_TRACE(second);
+        AgentProcess holder(folder()), reader(folder()), writer(folder());
+        ASSERT_TRUE(holder.beginsAndGets("a", "presenterlock 1", item()));
+        ASSERT_TRUE(holder.beginsAndGets("b", second, item()));
+        reader.begin("r", "read", item());
+        ASSERT_TRUE(awaitWaiting(reader, item(), false));
+        writer.begin("w", "write", item());
+        ASSERT_TRUE(awaitWaiting(writer, item(), true));
+        EXPECT_FALSE(reader.has("r") || writer.has("w"));
+        holder.end("b");
+        ASSERT_TRUE(writer.gets("w"));
+        writer.end("w");
+        ASSERT_TRUE(writer.expect("w out"));
+        EXPECT_FALSE(reader.has("r"));
+        holder.end("a");
+        EXPECT_TRUE(reader.gets("r"));
+    }
+}

@@ -286,13 +286,35 @@ TEST_F(FaultTest, WithoutTicketsAccessStillExcludesAndEnds)
     EXPECT_TRUE(reader.expect("r out"));
 }
 
+TEST_F(FaultTest, WhoWaitsStandsBehindTheLastTicketWhateverGapsTheKilledLeft)
+{
+    const ItemWindow window(CoordinatedItem(itemURL()).key());
+    const std::vector<std::int64_t> sets[] = {{0},       {0, 1, 2, 3, 4, 5, 6},          {0, 5, 6},         {3},
+                                              {0, 1000}, {2, 4, 8, 9, 200, 4000, 70000}, {kTicketCount - 2}};
+    for (const auto& taken : sets)
+        for (const std::int64_t tickets : {kWriterTickets, kReaderTickets}) {
+            AgentProcess holder(folder()), writer(folder());
+            ASSERT_TRUE(holder.beginsAndGets("h", "write", item()));
+            Descriptor others = CoordinationDirectory::current()->takeStripe(window.stripe);
+            for (const std::int64_t number : taken)
+                ASSERT_TRUE(tryLock(others.get(), window.range(tickets + number), LockKind::exclusive));
+            writer.begin("w", "write", item());
+            ASSERT_TRUE(awaitWaiting(writer, item(), true));
+            const auto found = findExclusiveLock(others.get(), window.range(kWriterTickets, kTicketCount));
+            ASSERT_TRUE(found);
+            EXPECT_EQ(window.offsetOf(found->start) - kWriterTickets, taken.back() + 1);
+            EXPECT_EQ(found->length, 1);
+        }
+}
+
 // Whoever is present and has nothing to be asked through has just ended, or begun: its slot is for others then.
 TEST_F(FaultTest, ThePresenceOfOneWhoCannotBeAskedIsWaitedForAndLeftAlone)
 {
     const ItemWindow window(CoordinatedItem(itemURL()).key());
     Descriptor gone = CoordinationDirectory::current()->takeStripe(window.stripe);
-    for (const bool isWriting : {false, true}) {
-        const ByteRange byte = {window.presence(isWriting).start + 3, 1};
+    for (const auto& [askedBy, isWriting] : {std::pair(AskedBy::readers, false), std::pair(AskedBy::writers, true),
+                                             std::pair(AskedBy::both, false), std::pair(AskedBy::both, true)}) {
+        const ByteRange byte = window.range(presenceOffset(askedBy) + 3);
         ASSERT_TRUE(tryLock(gone.get(), byte, LockKind::exclusive));
         AgentProcess comer(folder());
         comer.begin("c", isWriting ? "write" : "read", item());

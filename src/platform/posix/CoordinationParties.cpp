@@ -65,12 +65,14 @@ void addParties(int process, int stripe, const std::vector<HeldLock>& locks, std
     for (const HeldLock& lock : locks) {
         const std::int64_t window = lock.start / kWindowSize, offset = lock.start % kWindowSize;
         const bool isOfWriters = offset >= kWriterPresence && offset < kWriterTickets;
+        const bool isOfReaders = offset >= kReaderPresence || (isOfWriters && offset >= kCommonPresence);
         const std::uint64_t item = static_cast<std::uint64_t>(stripe) << 38 | static_cast<std::uint64_t>(window);
         if (offset == kDataByte)
             parties.push_back({process, Role::holds, lock.isExclusive, item});
-        else if (isOfWriters || offset >= kReaderPresence) {
-            if (lock.isExclusive) // a shared one only waits for it to fall
-                parties.push_back({process, Role::presents, isOfWriters, item});
+        else if (isOfWriters || isOfReaders) {
+            for (const bool byWriters : {false, true})
+                if (lock.isExclusive && (byWriters ? isOfWriters : isOfReaders)) // a shared one waits for it to fall
+                    parties.push_back({process, Role::presents, byWriters, item});
         } else if (!hasLock(window, kDataByte, kDataByte + 1))
             parties.push_back(
                 {process, Role::waits,

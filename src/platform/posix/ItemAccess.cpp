@@ -61,12 +61,8 @@ void ItemAccess::acquireInQueue()
 {
     const ByteRange turn = window_.range(kQueueByte, 2);
     static_assert(kAskingByte == kQueueByte + 1);
-    bool isHad = tryLock(number(), turn, LockKind::exclusive);
-    if (isHad && someoneWaits()) {
-        unlock(number(), turn);
-        isHad = false;
-    }
-    if (!isHad) {
+    // The look comes first: who is about to take his turn must not find it taken for the moment of a look.
+    if (someoneWaits() || !tryLock(number(), turn, LockKind::exclusive)) {
         takeTicket(kWriterTickets);
         awaitTickets({kWriterTickets, kReaderTickets});
         waitForLock(number(), turn, LockKind::exclusive);
@@ -89,16 +85,19 @@ void ItemAccess::acquireInQueue()
     }
 }
 
+/// Those who are present now. Whoever has come meanwhile is found by the look that follows with data in hand.
 void ItemAccess::askInQueue()
 {
-    for (std::vector<int> present = presentSlots(true); !present.empty(); present = presentSlots(true)) {
-        dropTicket(kWriterTickets); // the asking byte is ours: readers behind us look again, and pass
-        Questions questions(*directory_);
-        const std::vector<int> unreachable = ask(questions, present, true, true);
-        questions.wait();
-        agreed_.insert(agreed_.end(), questions.agreed().begin(), questions.agreed().end());
-        awaitAbsence(unreachable, true);
-    }
+    const std::vector<int> present = presentSlots(true);
+    if (present.empty())
+        return;
+    dropTicket(kWriterTickets); // the asking byte is ours: readers behind us look again, and pass
+    spent_.clear();
+    Questions questions(*directory_, spent_);
+    const std::vector<int> unreachable = ask(questions, present, true, true);
+    questions.wait();
+    agreed_.insert(agreed_.end(), questions.agreed().begin(), questions.agreed().end());
+    awaitAbsence(unreachable, true);
 }
 
 /// Without the queue, an agreement counts only when it was given while the data byte was ours: nobody can come to hold
@@ -108,13 +107,14 @@ void ItemAccess::acquireAskingUnderData(LockKind kind, bool isWriter)
     for (;;) {
         takeData(kind);
         agreed_.clear();
+        spent_.clear();
         std::vector<int> unreachable;
-        Questions questions(*directory_);
+        Questions questions(*directory_, spent_);
         for (std::vector<int> present = presentSlots(isWriter); unreachable.empty(); present = presentSlots(isWriter)) {
             if (present.empty())
                 return;
             unreachable = ask(questions, present, isWriter, false);
-            if (!questions.wait(kMoment))
+            if (!questions.waitFor(kMoment))
                 break;
             agreed_ = questions.agreed();
         }
@@ -131,7 +131,7 @@ bool ItemAccess::tryToAcquireForReading()
 {
     if (!lockNow(kDataByte, LockKind::shared))
         return false;
-    if (!someoneIsThere(kWriterTickets, kReaderPresence + kSlotCount, false))
+    if (!someoneIsThere(kCommonPresence, kReaderPresence + kSlotCount))
         return isAcquired_ = true;
     unlockByte(kDataByte);
     return false;
@@ -144,7 +144,7 @@ bool ItemAccess::tryToAcquireForWriting()
     static_assert(kQueueByte == kDataByte + 1);
     if (!tryLock(number(), both, LockKind::exclusive))
         return false;
-    if (!someoneIsThere(kWriterPresence, kReaderTickets + kTicketCount, true))
+    if (!someoneIsThere(kWriterPresence, kReaderTickets + kTicketCount))
         return isAcquired_ = true;
     unlock(number(), both);
     return false;
@@ -152,20 +152,21 @@ bool ItemAccess::tryToAcquireForWriting()
 
 /// Looked up anew each time, with the queue or data in hand: another presenter here may have come to hold the item
 /// meanwhile.
-int ItemAccess::ownSlot(bool isWriter) const
+std::optional<std::int64_t> ItemAccess::ownPresence() const
 {
-    return own_ == nullptr ? -1 : PresenterRegistry::shared().slotOfOnly(own_, key_, isWriter, *directory_);
+    if (own_ == nullptr)
+        return std::nullopt;
+    return PresenterRegistry::shared().presenceOfOnly(own_, key_, *directory_);
 }
 
 /// Whether an exclusive lock of others lies from one offset up to another, our own presence apart.
-bool ItemAccess::someoneIsThere(std::int64_t from, std::int64_t to, bool isWriter)
+bool ItemAccess::someoneIsThere(std::int64_t from, std::int64_t to)
 {
-    const int slot = ownSlot(isWriter);
-    if (slot < 0)
+    const auto own = ownPresence();
+    if (!own || *own < from || *own >= to)
         return findExclusiveLock(number(), window_.range(from, to - from)).has_value();
-    const std::int64_t own = (isWriter ? kWriterPresence : kReaderPresence) + slot;
-    return (from < own && findExclusiveLock(number(), window_.range(from, own - from))) ||
-           (own + 1 < to && findExclusiveLock(number(), window_.range(own + 1, to - own - 1)));
+    return (from < *own && findExclusiveLock(number(), window_.range(from, *own - from))) ||
+           (*own + 1 < to && findExclusiveLock(number(), window_.range(*own + 1, to - *own - 1)));
 }
 
 /// The data byte alone, without the queue. First come, first served, save that writers behind one that asks are passed:
@@ -195,15 +196,20 @@ bool ItemAccess::someoneWaits()
     return findExclusiveLock(number(), window_.range(kWriterTickets, 2 * kTicketCount)).has_value();
 }
 
-/// One past the last ticket that is taken.
+/// One past the last ticket that is taken. Each query costs the kernel a walk over all who wait, so it is found by
+/// leaps that double, then halve, not one by one.
 std::int64_t ItemAccess::nextTicket(std::int64_t tickets)
 {
-    std::int64_t next = 0;
-    while (next < kTicketCount) {
-        const auto taken = findExclusiveLock(number(), window_.range(tickets + next, kTicketCount - next));
-        if (!taken)
-            break;
-        next = window_.offsetOf(taken->end()) - tickets;
+    std::int64_t next = 0, end = kTicketCount, leap = 0; // taken below `next` alone, free from `end` on
+    while (next < end) {
+        const std::int64_t from = std::min(next + leap, end - 1);
+        if (const auto taken = findExclusiveLock(number(), window_.range(tickets + from, end - from))) {
+            next = window_.offsetOf(taken->end()) - tickets;
+            leap = std::max(2 * leap, std::int64_t{1});
+        } else {
+            end = from;
+            leap = (end - next) / 2;
+        }
     }
     return next;
 }
@@ -262,35 +268,40 @@ std::optional<ByteRange> ItemAccess::lowestWriterAhead()
 /// The slots whose processes have to be asked still: those that agreed are not, nor our own presenter.
 std::vector<int> ItemAccess::presentSlots(bool isWriter)
 {
-    std::vector<int> known = agreed_;
-    if (const int own = ownSlot(isWriter); own >= 0)
-        known.push_back(own);
-    std::sort(known.begin(), known.end());
-    std::vector<int> present;
-    const std::int64_t first = window_.presence(isWriter).start;
-    int next = 0;
-    for (const int slot : known) {
-        findPresent(first, next, slot, present);
-        next = slot + 1;
+    std::vector<std::int64_t> present;
+    findPresent(isWriter ? kWriterPresence : kCommonPresence, kWriterTickets, present);
+    if (!isWriter)
+        findPresent(kReaderPresence, kReaderPresence + kSlotCount, present);
+    if (present.empty())
+        return {};
+    const auto own = ownPresence();
+    std::vector<int> slots;
+    for (const std::int64_t offset : present) {
+        static_assert(kWriterPresence % kSlotCount == 0 && kReaderPresence % kSlotCount == 0);
+        const int slot = static_cast<int>(offset % kSlotCount);
+        if (offset != own && std::find(agreed_.begin(), agreed_.end(), slot) == agreed_.end())
+            slots.push_back(slot);
     }
-    findPresent(first, next, kSlotCount, present);
-    return present;
+    std::sort(slots.begin(), slots.end());
+    slots.erase(std::unique(slots.begin(), slots.end()), slots.end()); // of the two kinds that a process may have
+    return slots;
 }
 
-/// Those from slot `from` up to `to`. A query gives any lock of its range, so the rest is left on both sides of it.
-void ItemAccess::findPresent(std::int64_t first, int from, int to, std::vector<int>& present)
+/// The presence bytes from one offset up to another. A query gives any lock of its range, so the rest is left on both
+/// sides of it.
+void ItemAccess::findPresent(std::int64_t from, std::int64_t to, std::vector<std::int64_t>& present)
 {
     if (from >= to)
         return;
-    const auto taken = findExclusiveLock(number(), {first + from, to - from});
+    const auto taken = findExclusiveLock(number(), window_.range(from, to - from));
     if (!taken)
         return;
-    const int begin = static_cast<int>(std::max(taken->start - first, std::int64_t{from}));
-    const int end = static_cast<int>(std::min(taken->end() - first, std::int64_t{to}));
-    for (int slot = begin; slot < end; ++slot)
-        present.push_back(slot);
-    findPresent(first, from, begin, present);
-    findPresent(first, end, to, present);
+    const std::int64_t begin = std::max(window_.offsetOf(taken->start), from);
+    const std::int64_t end = std::min(window_.offsetOf(taken->end()), to);
+    for (std::int64_t offset = begin; offset < end; ++offset)
+        present.push_back(offset);
+    findPresent(from, begin, present);
+    findPresent(end, to, present);
 }
 
 /// Gives back the slots at which nobody listens.
@@ -309,14 +320,15 @@ std::vector<int> ItemAccess::ask(Questions& questions, const std::vector<int>& s
     return unreachable;
 }
 
-/// Who has just ended, or cannot be reached, is absent when its presence byte falls.
+/// Who has just ended, or cannot be reached, is absent when its presence bytes fall.
 void ItemAccess::awaitAbsence(const std::vector<int>& slots, bool ofWriters)
 {
-    for (const int slot : slots) {
-        const ByteRange byte = {window_.presence(ofWriters).start + slot, 1};
-        waitForLock(number(), byte, LockKind::shared);
-        unlock(number(), byte);
-    }
+    for (const int slot : slots)
+        for (const AskedBy askedBy : {ofWriters ? AskedBy::writers : AskedBy::readers, AskedBy::both}) {
+            const ByteRange byte = window_.range(presenceOffset(askedBy) + slot);
+            waitForLock(number(), byte, LockKind::shared);
+            unlock(number(), byte);
+        }
 }
 
 } // namespace platform

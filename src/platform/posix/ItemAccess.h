@@ -7,6 +7,8 @@
 
 #include <initializer_list>
 #include <memory>
+#include <optional>
+#include <vector>
 
 namespace platform {
 
@@ -44,10 +46,10 @@ private:
     std::optional<ByteRange> lowestWriterAhead();
     std::vector<int> ask(Questions& questions, const std::vector<int>& slots, bool isWriter, bool holdsQueue);
     std::vector<int> presentSlots(bool isWriter);
-    void findPresent(std::int64_t first, int from, int to, std::vector<int>& present);
+    void findPresent(std::int64_t from, std::int64_t to, std::vector<std::int64_t>& present);
     void awaitAbsence(const std::vector<int>& slots, bool ofWriters);
-    int ownSlot(bool isWriter) const;
-    bool someoneIsThere(std::int64_t from, std::int64_t to, bool isWriter);
+    std::optional<std::int64_t> ownPresence() const;
+    bool someoneIsThere(std::int64_t from, std::int64_t to);
 
     bool lockNow(std::int64_t offset, LockKind kind) { return tryLock(number(), window_.range(offset), kind); }
     void unlockByte(std::int64_t offset) { unlock(number(), window_.range(offset)); }
@@ -59,6 +61,7 @@ private:
     const FilePresenter* own_;
     std::vector<int> agreed_;            // slots
     std::optional<std::int64_t> ticket_; // kTicketCount: behind all that have one
+    std::vector<Descriptor> spent_;      // sockets of questions that were answered, closed when access ends
     Descriptor stripe_;
     bool isAcquired_ = false;
 };

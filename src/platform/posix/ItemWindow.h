@@ -1,7 +1,7 @@
 // Which bytes of which stripe file stand for an item, and what each of them means.
 #pragma once
 
-#include "platform/SecureHash.h"
+#include "platform/FileCoordination.h"
 #include "platform/posix/RangeLock.h"
 
 #include <cstdint>
@@ -14,20 +14,29 @@ inline constexpr int kSlotCount = 1 << 16;
 inline constexpr std::int64_t kTicketCount = 1 << 22;
 
 /// Offsets in a window, lowest first. What a writer looks for (whoever presents to writers, whoever waits) lies
-/// together, and so does what a reader looks for, so that one query answers each.
+/// together, and so does what a reader looks for, so that one query answers each; and who presents to both has one
+/// byte to raise.
 enum WindowOffset : std::int64_t {
     kDataByte = 0,              // exclusive: a writer has access; shared: readers have
     kQueueByte = 1,             // exclusive: a writer has its turn, and access or asks for it
     kAskingByte = 2,            // exclusive: that writer asks presenters, and readers need not wait for those behind it
     kParkedByte = 3,            // shared: waits for presenters, and holds nothing else; for listings only
-    kWriterPresence = 0x100000, // exclusive, one per slot: that process must be asked by writers
+    kWriterPresence = 0x0F0000, // exclusive, one per slot: that process must be asked by writers
+    kCommonPresence = 0x100000, // by writers and readers
     kWriterTickets = 0x110000,  // exclusive, one each: a writer waits; numbered in one sequence with …
     kReaderTickets = 0x510000,  // … these: waits for the data byte alone
-    kReaderPresence = 0x910000, // exclusive, one per slot: that process must be asked by readers
+    kReaderPresence = 0x910000, // by readers
     kWindowSize = 0x1000000,
 };
-static_assert(kWriterPresence + kSlotCount == kWriterTickets && kWriterTickets + kTicketCount == kReaderTickets);
+static_assert(kWriterPresence + kSlotCount == kCommonPresence && kCommonPresence + kSlotCount == kWriterTickets);
+static_assert(kWriterTickets + kTicketCount == kReaderTickets);
 static_assert(kReaderTickets + kTicketCount == kReaderPresence && kReaderPresence + kSlotCount < kWindowSize);
+
+/// Of the presence of those who are asked by these; that of a slot lies its number behind.
+inline std::int64_t presenceOffset(AskedBy askedBy)
+{
+    return askedBy == AskedBy::both ? kCommonPresence : askedBy == AskedBy::writers ? kWriterPresence : kReaderPresence;
+}
 
 /// Eight bits of the key choose the stripe and 38 the window in it. Items that share all 46 would merely wait for each
 /// other.
@@ -44,10 +53,6 @@ struct ItemWindow {
 
     ByteRange range(std::int64_t offset, std::int64_t length = 1) const { return {base + offset, length}; }
     ByteRange whole() const { return range(0, kWindowSize); }
-    ByteRange presence(bool ofWriters) const
-    {
-        return range(ofWriters ? kWriterPresence : kReaderPresence, kSlotCount);
-    }
     /// What stands at an absolute offset of the stripe, counted from the window's start.
     std::int64_t offsetOf(std::int64_t position) const { return position - base; }
 };

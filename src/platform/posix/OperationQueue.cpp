@@ -2,22 +2,26 @@
 
 #include "platform/posix/Descriptor.h"
 
-#include <atomic>
+#include <cerrno>
 #include <chrono>
-#include <condition_variable>
 #include <deque>
 #include <mutex>
 #include <system_error>
 #include <thread>
+#include <utility>
+#include <vector>
 
 #include <pthread.h>
+#include <semaphore.h>
 #include <signal.h>
+#include <time.h>
 
 namespace platform {
 
 namespace {
 
-/// The threads that wait for work. A forked child begins with an empty set: its threads did not come along.
+/// The threads that wait for work. A forked child begins with an empty set: its threads did not come along. Work is
+/// handed to one of them, the one that parked last: what it has just done is still in the processor's caches.
 class BackgroundThreads {
 public:
     static BackgroundThreads& shared();
@@ -25,17 +29,58 @@ public:
     bool run(std::function<void()> work)
     {
         std::unique_lock lock(mutex_);
-        if (idle_ > work_.size()) {
-            work_.push_back(std::move(work));
-            wake_.notify_one();
-            return true;
+        if (parked_.empty()) {
+            lock.unlock();
+            return startThread(std::move(work));
         }
+        const std::shared_ptr<Parked> last = std::move(parked_.back());
+        parked_.pop_back();
         lock.unlock();
-        return startThread(std::move(work));
+        last->give(std::move(work));
+        return true;
     }
 
 private:
     static constexpr std::chrono::seconds kIdleTime{1};
+
+    /// A thread's place to wait for work, shared with who gives it: the thread may end before that is done. A
+    /// semaphore, as a condition makes whoever wakes take a mutex, and calls the system once more when it gives that
+    /// back.
+    class Parked {
+    public:
+        Parked() { ::sem_init(&given_, 0, 0); }
+        ~Parked() { ::sem_destroy(&given_); }
+        Parked(const Parked&) = delete;
+        Parked& operator=(const Parked&) = delete;
+
+        void give(std::function<void()> work)
+        {
+            work_ = std::move(work);
+            ::sem_post(&given_);
+        }
+        /// False when there was none for so long; a clock that is set meanwhile makes that shorter or longer.
+        bool waitFor(std::chrono::seconds length)
+        {
+            timespec end = {};
+            ::clock_gettime(CLOCK_REALTIME, &end);
+            end.tv_sec += length.count();
+            int result = 0;
+            do
+                result = ::sem_timedwait(&given_, &end);
+            while (result != 0 && errno == EINTR);
+            return result == 0;
+        }
+        void wait()
+        {
+            while (::sem_wait(&given_) != 0) {
+            }
+        }
+        std::function<void()> take() { return std::exchange(work_, nullptr); }
+
+    private:
+        sem_t given_;
+        std::function<void()> work_;
+    };
 
     bool startThread(std::function<void()> work)
     {
@@ -55,24 +100,26 @@ private:
 
     void serve(std::function<void()> work)
     {
+        const auto mine = std::make_shared<Parked>();
         for (;;) {
             work();
             work = nullptr; // what it captured goes before the wait
             std::unique_lock lock(mutex_);
-            ++idle_;
-            wake_.wait_for(lock, kIdleTime, [this] { return !work_.empty(); });
-            --idle_;
-            if (work_.empty())
-                return;
-            work = std::move(work_.front());
-            work_.pop_front();
+            parked_.push_back(mine);
+            lock.unlock();
+            if (!mine->waitFor(kIdleTime)) {
+                lock.lock();
+                if (std::erase(parked_, mine) > 0)
+                    return;
+                lock.unlock();
+                mine->wait(); // it was chosen in that moment
+            }
+            work = mine->take();
         }
     }
 
     std::mutex mutex_;
-    std::condition_variable wake_;
-    std::deque<std::function<void()>> work_; // never more than there are idle threads
-    std::size_t idle_ = 0;
+    std::vector<std::shared_ptr<Parked>> parked_; // without work
 };
 
 BackgroundThreads& BackgroundThreads::shared()

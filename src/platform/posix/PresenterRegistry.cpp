@@ -25,9 +25,9 @@ private:
     std::shared_ptr<Connection> connection_;
 };
 
-unsigned bitOf(bool writers)
+bool asks(bool isWriter, AskedBy askedBy)
 {
-    return static_cast<unsigned>(writers ? AskedBy::writers : AskedBy::readers);
+    return askedBy == AskedBy::both || askedBy == (isWriter ? AskedBy::writers : AskedBy::readers);
 }
 
 std::uint64_t randomNumber()
@@ -96,7 +96,7 @@ void PresenterRegistry::add(const std::shared_ptr<FilePresenter>& presenter, con
     if (!registrations_.emplace(presenter.get(), registration).second)
         return;
     try {
-        change(*registration, static_cast<unsigned>(askedBy), retired);
+        change(*registration, askedBy, retired);
     } catch (...) {
         registrations_.erase(presenter.get());
         throw;
@@ -109,7 +109,7 @@ void PresenterRegistry::setAskedBy(const FilePresenter& presenter, AskedBy asked
     const std::lock_guard lock(mutex_);
     const auto found = registrations_.find(&presenter);
     if (found != registrations_.end())
-        change(*found->second, static_cast<unsigned>(askedBy), retired);
+        change(*found->second, askedBy, retired);
 }
 
 void PresenterRegistry::remove(const FilePresenter& presenter)
@@ -122,7 +122,7 @@ void PresenterRegistry::remove(const FilePresenter& presenter)
         if (found == registrations_.end())
             return;
         std::vector<std::unique_ptr<Home>> none;
-        change(*found->second, 0, none);
+        change(*found->second, AskedBy::nobody, none);
         for (Lane& lane : found->second->lanes) {
             owed.insert(owed.end(), std::move_iterator(lane.waiting.begin()), std::move_iterator(lane.waiting.end()));
             lane.waiting.clear();
@@ -145,16 +145,18 @@ void PresenterRegistry::followFolder()
         moveHome(retired);
 }
 
-int PresenterRegistry::slotOfOnly(const FilePresenter* own, const SHA256Digest& key, bool byWriter,
-                                  const CoordinationDirectory& directory)
+std::optional<std::int64_t> PresenterRegistry::presenceOfOnly(const FilePresenter* own, const SHA256Digest& key,
+                                                              const CoordinationDirectory& directory)
 {
     const std::lock_guard lock(mutex_);
     const auto found = registrations_.find(own);
     if (found == registrations_.end() || !homeNow_ || homeNow_->server.directory().get() != &directory ||
-        found->second->key != key || (found->second->askedBy & bitOf(byWriter)) == 0)
-        return -1;
-    const auto presence = presences_.find(key);
-    return presence != presences_.end() && presence->second[byWriter] == 1 ? homeNow_->server.slot() : -1;
+        found->second->key != key || found->second->askedBy == AskedBy::nobody)
+        return std::nullopt;
+    const auto presence = presences_.find({key, found->second->askedBy});
+    if (presence == presences_.end() || presence->second != 1)
+        return std::nullopt;
+    return presenceOffset(found->second->askedBy) + homeNow_->server.slot();
 }
 
 bool PresenterRegistry::owesQueue(const FilePresenter* presenter)
@@ -164,52 +166,45 @@ bool PresenterRegistry::owesQueue(const FilePresenter* presenter)
     return found != registrations_.end() && found->second->owedToQueue > 0;
 }
 
-/// Raises before it lowers, and lowers again what it raised when it cannot go on.
-void PresenterRegistry::change(Registration& registration, unsigned askedBy,
-                               std::vector<std::unique_ptr<Home>>& retired)
+/// Raises before it lowers.
+void PresenterRegistry::change(Registration& registration, AskedBy askedBy, std::vector<std::unique_ptr<Home>>& retired)
 {
-    unsigned raised = 0;
-    try {
-        for (const bool writers : {false, true})
-            if ((askedBy & ~registration.askedBy & bitOf(writers)) != 0) {
-                raise(registration.key, writers, retired);
-                raised |= bitOf(writers);
-            }
-    } catch (...) {
-        for (const bool writers : {false, true})
-            if ((raised & bitOf(writers)) != 0)
-                lower(registration.key, writers);
-        throw;
-    }
-    for (const bool writers : {false, true})
-        if ((registration.askedBy & ~askedBy & bitOf(writers)) != 0)
-            lower(registration.key, writers);
+    if (askedBy == registration.askedBy)
+        return;
+    if (askedBy != AskedBy::nobody)
+        raise(registration.key, askedBy, retired);
+    if (registration.askedBy != AskedBy::nobody)
+        lower(registration.key, registration.askedBy);
     registration.askedBy = askedBy;
 }
 
-void PresenterRegistry::raise(const SHA256Digest& key, bool ofWriters, std::vector<std::unique_ptr<Home>>& retired)
+void PresenterRegistry::raise(const SHA256Digest& key, AskedBy askedBy, std::vector<std::unique_ptr<Home>>& retired)
 {
-    const auto presence = presences_.find(key);
-    if (presence == presences_.end() || presence->second[ofWriters] == 0) {
-        for (bool isRaised = false; !isRaised;)
+    const auto presence = presences_.emplace(std::pair(key, askedBy), 0).first;
+    try {
+        for (bool isRaised = presence->second > 0; !isRaised;)
             try {
                 moveHome(retired);
-                isRaised = homeNow_->raise(key, ofWriters);
+                isRaised = homeNow_->raise(key, askedBy);
             } catch (const std::system_error& failure) {
                 if (failure.code().value() != ESTALE) // else there is another folder to move to
                     throw;
             }
+    } catch (...) {
+        presences_.erase(presence);
+        throw;
     }
-    ++presences_[key][ofWriters];
+    ++presence->second;
 }
 
-void PresenterRegistry::lower(const SHA256Digest& key, bool ofWriters)
+void PresenterRegistry::lower(const SHA256Digest& key, AskedBy askedBy)
 {
-    const auto presence = presences_.find(key);
-    if (--presence->second[ofWriters] == 0 && homeNow_)
-        homeNow_->lower(key, ofWriters);
-    if (presence->second[0] + presence->second[1] == 0)
-        presences_.erase(presence);
+    const auto presence = presences_.find({key, askedBy});
+    if (--presence->second > 0)
+        return;
+    if (homeNow_)
+        homeNow_->lower(key, askedBy);
+    presences_.erase(presence);
 }
 
 /// To the folder in force, when that is another: everything that is raised is raised there first.
@@ -219,9 +214,8 @@ void PresenterRegistry::moveHome(std::vector<std::unique_ptr<Home>>& retired)
         auto home = std::make_unique<Home>(*this, CoordinationDirectory::current());
         bool complete = true;
         if (homeNow_)
-            for (const auto& [key, counts] : presences_)
-                for (const bool writers : {false, true})
-                    complete = complete && (counts[writers] == 0 || home->raise(key, writers));
+            for (const auto& [presence, count] : presences_)
+                complete = complete && (count == 0 || home->raise(presence.first, presence.second));
         if (!complete) {
             retired.push_back(std::move(home));
             continue;
@@ -242,14 +236,14 @@ PresenterRegistry::Home::Home(PresenterRegistry& registry, std::shared_ptr<Coord
 
 PresenterRegistry::Home::~Home() = default;
 
-bool PresenterRegistry::Home::raise(const SHA256Digest& key, bool ofWriters)
+bool PresenterRegistry::Home::raise(const SHA256Digest& key, AskedBy askedBy)
 {
     const ItemWindow window(key);
     CoordinationDirectory& directory = *server.directory();
     auto stripe = stripes.find(window.stripe);
     if (stripe == stripes.end())
         stripe = stripes.emplace(window.stripe, Stripe{directory.takeStripe(window.stripe), 0}).first;
-    const ByteRange byte = {window.presence(ofWriters).start + server.slot(), 1};
+    const ByteRange byte = window.range(presenceOffset(askedBy) + server.slot());
     // The slot is ours, and so its byte, as soon as a killed predecessor's descriptors are all closed.
     waitForLock(stripe->second.descriptor.get(), byte, LockKind::exclusive);
     if (!directory.stillThere(stripe->second.descriptor))
@@ -258,13 +252,13 @@ bool PresenterRegistry::Home::raise(const SHA256Digest& key, bool ofWriters)
     return true;
 }
 
-void PresenterRegistry::Home::lower(const SHA256Digest& key, bool ofWriters)
+void PresenterRegistry::Home::lower(const SHA256Digest& key, AskedBy askedBy)
 {
     const ItemWindow window(key);
     const auto stripe = stripes.find(window.stripe);
     if (stripe == stripes.end())
         return;
-    unlock(stripe->second.descriptor.get(), {window.presence(ofWriters).start + server.slot(), 1});
+    unlock(stripe->second.descriptor.get(), window.range(presenceOffset(askedBy) + server.slot()));
     if (--stripe->second.raised == 0) {
         server.directory()->putStripe(window.stripe, std::move(stripe->second.descriptor));
         stripes.erase(stripe);
@@ -303,7 +297,7 @@ void PresenterRegistry::handle(const Request& request, const std::shared_ptr<Con
     const std::lock_guard lock(mutex_);
     for (const auto& [presenter, registration] : registrations_) {
         const bool isAsker = request.askerHome == home_ && request.asker == reinterpret_cast<std::uintptr_t>(presenter);
-        if (isAsker || registration->key != request.key || (registration->askedBy & bitOf(byWriter)) == 0)
+        if (isAsker || registration->key != request.key || !asks(byWriter, registration->askedBy))
             continue;
         registration->lanes[byWriter].waiting.push_back(
             std::make_shared<Answer>(*this, registration, reply, connection.get(), request));

@@ -10,11 +10,13 @@
 #include <map>
 #include <memory>
 #include <mutex>
+#include <optional>
+#include <utility>
 
 namespace platform {
 
-/// Presence bytes are raised for an item and a kind while a presenter here is to be asked. The mutex is never held
-/// while the host's code runs.
+/// A presence byte is raised for an item while presenters here are to be asked, one for each kind of those that ask.
+/// The mutex is never held while the host's code runs.
 class PresenterRegistry {
 public:
     static PresenterRegistry& shared();
@@ -30,10 +32,10 @@ public:
 
     /// The number of this copy of the library, in which the addresses of its presenters mean something.
     std::uint64_t home() const { return home_; }
-    /// The slot whose presence byte stands for `own` and no other presenter, so that an access of its own need not ask
-    /// there; -1 when there is none.
-    int slotOfOnly(const FilePresenter* own, const SHA256Digest& key, bool byWriter,
-                   const CoordinationDirectory& directory);
+    /// The presence byte that stands for `own` and no other presenter, by its offset in the item's window, so that an
+    /// access of its own need not ask there; none when there is none.
+    std::optional<std::int64_t> presenceOfOnly(const FilePresenter* own, const SHA256Digest& key,
+                                               const CoordinationDirectory& directory);
     /// Whether the presenter owes an answer to a writer that keeps the queue until it has it.
     bool owesQueue(const FilePresenter* presenter);
 
@@ -50,7 +52,7 @@ private:
         std::weak_ptr<FilePresenter> presenter;
         OperationQueue queue;
         SHA256Digest key;
-        unsigned askedBy = 0;
+        AskedBy askedBy = AskedBy::nobody;
         int owedToQueue = 0;
         std::array<Lane, 2> lanes; // readers, writers
     };
@@ -64,14 +66,14 @@ private:
 
         Home(PresenterRegistry& registry, std::shared_ptr<CoordinationDirectory> directory);
         ~Home();
-        bool raise(const SHA256Digest& key, bool ofWriters); // false when the folder was deleted
-        void lower(const SHA256Digest& key, bool ofWriters);
+        bool raise(const SHA256Digest& key, AskedBy askedBy); // false when the folder was deleted
+        void lower(const SHA256Digest& key, AskedBy askedBy);
     };
-    using Presences = std::map<SHA256Digest, std::array<int, 2>>; // presenters to be asked: by readers, by writers
+    using Presences = std::map<std::pair<SHA256Digest, AskedBy>, int>; // presenters whom these ask
 
-    void change(Registration& registration, unsigned askedBy, std::vector<std::unique_ptr<Home>>& retired);
-    void raise(const SHA256Digest& key, bool ofWriters, std::vector<std::unique_ptr<Home>>& retired);
-    void lower(const SHA256Digest& key, bool ofWriters);
+    void change(Registration& registration, AskedBy askedBy, std::vector<std::unique_ptr<Home>>& retired);
+    void raise(const SHA256Digest& key, AskedBy askedBy, std::vector<std::unique_ptr<Home>>& retired);
+    void lower(const SHA256Digest& key, AskedBy askedBy);
     void moveHome(std::vector<std::unique_ptr<Home>>& retired);
     void startNext(Registration& registration, bool byWriter, Answers& released);
     void handle(const Request& request, const std::shared_ptr<Connection>& connection);

@@ -12,10 +12,24 @@ namespace platform {
 
 void Connection::agree()
 {
+    Descriptor closed;
     const std::lock_guard lock(mutex_);
     const char yes = 1;
     if (socket_)
         ::send(socket_.get(), &yes, 1, MSG_NOSIGNAL | MSG_DONTWAIT);
+    closed = std::move(socket_);
+}
+
+bool Connection::isOpen() const
+{
+    const std::lock_guard lock(mutex_);
+    return static_cast<bool>(socket_);
+}
+
+ssize_t Connection::receive(Request& request) const
+{
+    const std::lock_guard lock(mutex_);
+    return socket_ ? ::recv(socket_.get(), &request, sizeof request, MSG_DONTWAIT | MSG_TRUNC) : 0;
 }
 
 void Connection::close()
@@ -50,20 +64,37 @@ Questions::Asked Questions::ask(int slot, const Request& request)
     return Asked::yes;
 }
 
-bool Questions::wait(std::optional<std::chrono::milliseconds> limit)
+/// What has come: an answer, or the end of the connection.
+void Questions::take(Open& answered)
+{
+    char answer = 0;
+    ssize_t got = 0;
+    do
+        got = ::recv(answered.socket.get(), &answer, 1, 0);
+    while (got < 0 && errno == EINTR);
+    if (got == 1)
+        agreed_.push_back(answered.slot);
+    spent_.push_back(std::move(answered.socket));
+}
+
+/// One after the other, as each of them is needed: the call that waits is the one that takes the answer.
+void Questions::wait()
+{
+    for (Open& one : open_)
+        take(one);
+    open_.clear();
+}
+
+bool Questions::waitFor(std::chrono::milliseconds limit)
 {
     using Clock = std::chrono::steady_clock;
-    const Clock::time_point end = Clock::now() + limit.value_or(std::chrono::milliseconds(0));
+    const Clock::time_point end = Clock::now() + limit;
     while (!open_.empty()) {
         std::vector<pollfd> polled;
         for (const Open& one : open_)
             polled.push_back({one.socket.get(), POLLIN, 0});
-        int timeout = -1;
-        if (limit) {
-            const auto left = std::chrono::ceil<std::chrono::milliseconds>(end - Clock::now()).count();
-            timeout = left > 0 ? static_cast<int>(left) : 0;
-        }
-        const int ready = ::poll(polled.data(), polled.size(), timeout);
+        const auto left = std::chrono::ceil<std::chrono::milliseconds>(end - Clock::now()).count();
+        const int ready = ::poll(polled.data(), polled.size(), left > 0 ? static_cast<int>(left) : 0);
         if (ready == 0)
             return false;
         if (ready < 0 && errno != EINTR)
@@ -71,9 +102,7 @@ bool Questions::wait(std::optional<std::chrono::milliseconds> limit)
         for (std::size_t i = polled.size(); ready > 0 && i-- > 0;) {
             if (polled[i].revents == 0)
                 continue;
-            char answer = 0;
-            if (::recv(polled[i].fd, &answer, 1, MSG_DONTWAIT) == 1)
-                agreed_.push_back(open_[i].slot);
+            take(open_[i]);
             open_.erase(open_.begin() + static_cast<std::ptrdiff_t>(i));
         }
     }

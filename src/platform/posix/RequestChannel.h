@@ -8,8 +8,9 @@
 #include <cstdint>
 #include <memory>
 #include <mutex>
-#include <optional>
 #include <vector>
+
+#include <sys/types.h>
 
 namespace platform {
 
@@ -32,12 +33,15 @@ class Connection {
 public:
     explicit Connection(Descriptor socket) : socket_(std::move(socket)) {}
 
-    int descriptor() const { return socket_.get(); } // for the thread that closes it
+    /// Answers, and ends the connection: from here on the asker can go without waking anybody.
     void agree();
     void close();
+    bool isOpen() const;
+    /// What has come: the size of the message, 0 at the asker's end, or -1 with EAGAIN when there is nothing.
+    ssize_t receive(Request& request) const;
 
 private:
-    std::mutex mutex_;
+    mutable std::mutex mutex_;
     Descriptor socket_;
 };
 
@@ -46,13 +50,18 @@ class Questions {
 public:
     enum class Asked { yes, nobodyThere };
 
-    explicit Questions(CoordinationDirectory& directory) : directory_(directory) {}
+    /// What has been answered goes to `spent`, as closing a socket takes longer than all that is left to do then.
+    Questions(CoordinationDirectory& directory, std::vector<Descriptor>& spent) : directory_(directory), spent_(spent)
+    {
+    }
 
     /// Throws std::system_error when there is no descriptor or memory for a socket.
     Asked ask(int slot, const Request& request);
     bool empty() const { return open_.empty(); }
-    /// Waits until every question has its answer or the end of its connection; false when `limit` passed first.
-    bool wait(std::optional<std::chrono::milliseconds> limit = std::nullopt);
+    /// Waits until every question has its answer or the end of its connection.
+    void wait();
+    /// The same; false when `limit` passed first.
+    bool waitFor(std::chrono::milliseconds limit);
     /// The slots whose processes agreed.
     const std::vector<int>& agreed() const { return agreed_; }
 
@@ -61,7 +70,10 @@ private:
         int slot;
         Descriptor socket;
     };
+    void take(Open& answered);
+
     CoordinationDirectory& directory_;
+    std::vector<Descriptor>& spent_;
     std::vector<Open> open_;
     std::vector<int> agreed_;
 };

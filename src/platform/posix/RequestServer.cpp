@@ -4,11 +4,13 @@
 #include "platform/posix/RangeLock.h"
 #include "platform/posix/SocketAddress.h"
 
+#include <array>
 #include <cerrno>
 #include <system_error>
+#include <utility>
 
-#include <poll.h>
 #include <signal.h>
+#include <sys/epoll.h>
 #include <sys/eventfd.h>
 #include <sys/socket.h>
 #include <unistd.h>
@@ -38,7 +40,9 @@ RequestServer::RequestServer(std::shared_ptr<CoordinationDirectory> directory, H
     takeSlot();
     listen();
     stop_ = Descriptor([] { return ::eventfd(0, EFD_CLOEXEC); });
-    if (!stop_)
+    events_ = Descriptor([] { return ::epoll_create1(EPOLL_CLOEXEC); });
+    if (!stop_ || !events_ || !watch(EPOLL_CTL_ADD, stop_.get(), kStopEvent) ||
+        !watch(EPOLL_CTL_ADD, listener_.get(), kListenerEvent))
         fail("coordination event");
     sigset_t all, before; // the host's signal handlers are the business of the host's threads
     sigfillset(&all);
@@ -57,7 +61,7 @@ RequestServer::~RequestServer()
     const std::uint64_t one = 1;
     [[maybe_unused]] const ssize_t written = ::write(stop_.get(), &one, sizeof one);
     thread_.join();
-    for (const Client& client : clients_)
+    for (const auto& [name, client] : clients_)
         client.connection->close();
     ::unlink(directory_->socketPath(slot_).c_str());
 }
@@ -88,28 +92,38 @@ void RequestServer::listen()
         fail("coordination socket");
 }
 
+/// A descriptor that is closed is watched no more: none is ever copied.
+bool RequestServer::watch(int operation, int descriptor, std::uint64_t name, bool isWanted)
+{
+    epoll_event event = {};
+    event.events = isWanted ? std::uint32_t{EPOLLIN} : 0;
+    event.data.u64 = name;
+    return ::epoll_ctl(events_.get(), operation, descriptor, &event) == 0;
+}
+
 void RequestServer::serve()
 {
     constexpr int kPauseWithoutDescriptors = 20; // milliseconds
-    bool canAccept = true;
-    for (;;) {
-        // Without descriptors clients wait in line: they must not take the end of a connection for an answer.
-        std::vector<pollfd> polled = {{stop_.get(), POLLIN, 0}, {canAccept ? listener_.get() : -1, POLLIN, 0}};
-        for (const Client& client : clients_)
-            polled.push_back({client.connection->descriptor(), POLLIN, 0});
-        ::poll(polled.data(), polled.size(), canAccept ? -1 : kPauseWithoutDescriptors);
-        if (polled[0].revents != 0)
-            return;
-        for (std::size_t i = polled.size(); i-- > 2;) {
-            const auto client = clients_.begin() + static_cast<std::ptrdiff_t>(i - 2);
-            if (polled[i].revents != 0 && !hear(*client)) {
-                client->connection->close();
-                handlers_.gone(*client->connection);
-                clients_.erase(client);
-            }
+    for (bool canAccept = true;;) {
+        std::array<epoll_event, 64> events;
+        const int count = ::epoll_wait(events_.get(), events.data(), static_cast<int>(events.size()),
+                                       canAccept ? -1 : kPauseWithoutDescriptors);
+        bool mayAccept = !canAccept;
+        for (int i = 0; i < count; ++i) {
+            const std::uint64_t name = events[static_cast<std::size_t>(i)].data.u64;
+            if (name == kStopEvent)
+                return;
+            if (name == kListenerEvent)
+                mayAccept = true;
+            else
+                hear(name);
         }
-        if (!canAccept || polled[1].revents != 0)
-            canAccept = acceptClients();
+        if (!mayAccept)
+            continue;
+        std::erase_if(clients_, [](const auto& client) { return !client.second.connection->isOpen(); }); // answered
+        // Without descriptors clients wait in line: they must not take the end of a connection for an answer.
+        if (const bool could = std::exchange(canAccept, acceptClients()); could != canAccept)
+            watch(EPOLL_CTL_MOD, listener_.get(), kListenerEvent, canAccept);
     }
 }
 
@@ -122,19 +136,28 @@ bool RequestServer::acceptClients()
             return errno != EMFILE && errno != ENFILE && errno != ENOBUFS && errno != ENOMEM;
         if (!isThisUser(socket.get()))
             continue;
-        clients_.push_back({std::make_shared<Connection>(std::move(socket)), false});
-        if (!hear(clients_.back())) { // most have asked already
-            clients_.back().connection->close();
-            handlers_.gone(*clients_.back().connection);
-            clients_.pop_back();
-        }
+        const std::uint64_t name = ++lastName_;
+        if (!watch(EPOLL_CTL_ADD, socket.get(), name))
+            return false;
+        clients_.emplace(name, Client{std::make_shared<Connection>(std::move(socket)), false});
+        hear(name); // most have asked already
     }
 }
 
-bool RequestServer::hear(Client& client)
+void RequestServer::hear(std::uint64_t name)
+{
+    const auto client = clients_.find(name);
+    if (client == clients_.end() || takeRequest(client->second))
+        return;
+    client->second.connection->close();
+    handlers_.gone(*client->second.connection);
+    clients_.erase(client);
+}
+
+bool RequestServer::takeRequest(Client& client)
 {
     Request request;
-    const ssize_t got = ::recv(client.connection->descriptor(), &request, sizeof request, MSG_DONTWAIT | MSG_TRUNC);
+    const ssize_t got = client.connection->receive(request);
     if (got < 0)
         return errno == EAGAIN || errno == EINTR;
     if (client.hasAsked || got != static_cast<ssize_t>(sizeof request) || request.magic != Request::kMagic)

@@ -4,6 +4,7 @@
 #include "platform/posix/RequestChannel.h"
 
 #include <functional>
+#include <map>
 #include <thread>
 
 namespace platform {
@@ -28,15 +29,18 @@ public:
     const std::shared_ptr<CoordinationDirectory>& directory() const { return directory_; }
 
 private:
+    static constexpr std::uint64_t kStopEvent = 0, kListenerEvent = 1;
     struct Client {
         std::shared_ptr<Connection> connection;
         bool hasAsked = false;
     };
     void takeSlot();
     void listen();
+    bool watch(int operation, int descriptor, std::uint64_t name, bool isWanted = true);
     void serve();
     bool acceptClients();
-    bool hear(Client& client); // false when it has gone
+    void hear(std::uint64_t name);
+    bool takeRequest(Client& client); // false when it has gone
 
     std::shared_ptr<CoordinationDirectory> directory_;
     Handlers handlers_;
@@ -44,7 +48,9 @@ private:
     int slot_ = -1;
     Descriptor listener_;
     Descriptor stop_;
-    std::vector<Client> clients_; // of the thread
+    Descriptor events_;
+    std::map<std::uint64_t, Client> clients_; // of the thread, by the names of their events
+    std::uint64_t lastName_ = kListenerEvent;
     std::thread thread_;
 };
 

@@ -43,6 +43,10 @@ TEST(SymbolicLinks, AreResolvedAsFarAsThePathExists)
         const char* expected;
     };
     const Case cases[] = {{"link/file", "real/file"},
+                          {"real/file", "real/file"}, // without a link, in one call of the system …
+                          {"real/missing/x", "real/missing/x"},
+                          {"real/inner/", "real/inner"}, // … and what that call would leave as it is
+                          {"real//inner/.././file", "real/file"},
                           {"link/inner/../file", "real/file"},
                           {"link/missing/x", "real/missing/x"},
                           {"link/missing/../other//y/.", "real/other/y"},

@@ -26,10 +26,14 @@ bool Connection::isOpen() const
     return static_cast<bool>(socket_);
 }
 
-ssize_t Connection::receive(Request& request) const
+Connection::Heard Connection::receive(Request& request) const
 {
     const std::lock_guard lock(mutex_);
-    return socket_ ? ::recv(socket_.get(), &request, sizeof request, MSG_DONTWAIT | MSG_TRUNC) : 0;
+    const ssize_t got = socket_ ? ::recv(socket_.get(), &request, sizeof request, MSG_DONTWAIT | MSG_TRUNC) : 0;
+    if (got < 0 && (errno == EAGAIN || errno == EINTR))
+        return Heard::nothing;
+    const bool isRequest = got == static_cast<ssize_t>(sizeof request) && request.magic == Request::kMagic;
+    return isRequest ? Heard::request : Heard::end;
 }
 
 void Connection::close()

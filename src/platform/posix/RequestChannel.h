@@ -10,8 +10,6 @@
 #include <mutex>
 #include <vector>
 
-#include <sys/types.h>
-
 namespace platform {
 
 /// A question, as it travels between processes on one machine.
@@ -37,8 +35,9 @@ public:
     void agree();
     void close();
     bool isOpen() const;
-    /// What has come: the size of the message, 0 at the asker's end, or -1 with EAGAIN when there is nothing.
-    ssize_t receive(Request& request) const;
+    enum class Heard { request, nothing, end };
+    /// What has come, without waiting; a message that is none of ours is an end.
+    Heard receive(Request& request) const;
 
 private:
     mutable std::mutex mutex_;

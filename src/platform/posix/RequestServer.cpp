@@ -157,12 +157,11 @@ void RequestServer::hear(std::uint64_t name)
 bool RequestServer::takeRequest(Client& client)
 {
     Request request;
-    const ssize_t got = client.connection->receive(request);
-    if (got < 0)
-        return errno == EAGAIN || errno == EINTR;
-    if (client.hasAsked || got != static_cast<ssize_t>(sizeof request) || request.magic != Request::kMagic)
+    const Connection::Heard heard = client.connection->receive(request);
+    if (heard != Connection::Heard::request)
+        return heard == Connection::Heard::nothing;
+    if (std::exchange(client.hasAsked, true))
         return false;
-    client.hasAsked = true;
     handlers_.request(request, client.connection);
     return true;
 }

@@ -2,17 +2,59 @@
 
 #include "platform/posix/AbsolutePath.h"
 
+#include <cerrno>
 #include <climits>
 #include <cstdlib>
 #include <memory>
+
+#include <fcntl.h>
+#include <linux/openat2.h>
+#include <sys/syscall.h>
+#include <unistd.h>
 
 namespace platform {
 
 namespace {
 
+/// Whether resolving leaves the text of an absolute path as it is, save for links.
+bool isNormal(std::string_view path)
+{
+    while (!path.empty()) {
+        const std::size_t slash = path.find('/', 1);
+        const std::string_view component = path.substr(1, slash == path.npos ? slash : slash - 1);
+        if (component.empty() || component == "." || component == "..")
+            return false;
+        path.remove_prefix(slash == path.npos ? path.size() : slash);
+    }
+    return true;
+}
+
+enum class Walked { found, missing, unknown };
+
+/// Looks for an item in one call, which fails at a link, where `realpath` takes a call for each component. What is
+/// found is looked for anew each time: a folder that was resolved before may have another name by now.
+Walked walkWithoutLinks(const char* path)
+{
+    open_how how = {};
+    how.flags = O_PATH | O_CLOEXEC;
+    how.resolve = RESOLVE_NO_SYMLINKS;
+    const int item = static_cast<int>(::syscall(SYS_openat2, AT_FDCWD, path, &how, sizeof how));
+    if (item < 0)
+        return errno == ENOENT ? Walked::missing : Walked::unknown;
+    ::close(item);
+    return Walked::found;
+}
+
 /// False when no such item exists.
 bool resolve(const char* path, std::string& resolved)
 {
+    if (isNormal(path)) {
+        const Walked walked = walkWithoutLinks(path);
+        if (walked == Walked::found)
+            resolved = path;
+        if (walked != Walked::unknown)
+            return walked == Walked::found;
+    }
     char buffer[PATH_MAX];
     if (::realpath(path, buffer) == nullptr)
         return false;

@@ -57,8 +57,10 @@ public:
     }
     void relinquishPresentedItemToWriter(Reacquirer reacquirer) override
     {
-        if (behaviour_ == "never")
+        if (behaviour_ == "never") {
+            const std::lock_guard lock(mutex_);
             kept_ = reacquirer;
+        }
         say(name_ + " asked by writer");
         if (behaviour_ == "save") {
             Error error;
@@ -75,12 +77,17 @@ public:
             reacquirer();
         } // drop: the last copy goes when this returns
     }
-    void answer() { std::exchange(kept_, nullptr)(); }
+    void answer()
+    {
+        const std::lock_guard lock(mutex_);
+        std::exchange(kept_, nullptr)();
+    }
 
 private:
     const std::string name_, behaviour_;
     const URLRef url_;
     OperationQueue queue_{2};
+    std::mutex mutex_; // of `kept_`: the command to answer comes on another thread
     Reacquirer kept_;
 };
 

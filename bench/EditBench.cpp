@@ -3,11 +3,13 @@
 #include "audiofile/CAudioFileIO.h"
 #include "audiofile/CContainerEdit.h"
 #include "audiofile/ContainerChanges.h"
+#include "platform/OwnedDescriptor.h"
 #include "platform/core/ByteWriter.h"
 
 #include <benchmark/benchmark.h>
 
 #include <fcntl.h>
+#include <sys/stat.h>
 #include <unistd.h>
 
 #include <algorithm>
@@ -17,6 +19,7 @@
 #include <filesystem>
 #include <fstream>
 #include <string>
+#include <thread>
 #include <time.h>
 #include <vector>
 
@@ -30,7 +33,7 @@ constexpr std::size_t kStart = 12 + 24 + 8 + 1024 + 8;
 /// A WAVE file with a chunk of 1 KiB ahead of its samples, which are a hole of `dataSize` bytes. Removed at the end.
 class LargeFile {
 public:
-    explicit LargeFile(std::int64_t dataSize) : length_(static_cast<std::int64_t>(kStart) + dataSize)
+    explicit LargeFile(std::int64_t dataSize = kDataSize) : length_(static_cast<std::int64_t>(kStart) + dataSize)
     {
         std::string pattern = std::filesystem::temp_directory_path() / "ktfiles-bench-XXXXXX";
         descriptor_ = mkstemp(pattern.data());
@@ -60,9 +63,12 @@ public:
     LargeFile& operator=(const LargeFile&) = delete;
 
     /// As it was made, as far as the edits below change it.
-    void restore()
+    void restore() const
     {
-        if (ftruncate(descriptor_, length_) != 0 || pwrite(descriptor_, "note", 4, 36) != 4)
+        ByteWriter size(std::endian::little);
+        size.write(static_cast<std::uint32_t>(length_ - 8));
+        if (ftruncate(descriptor_, length_) != 0 || pwrite(descriptor_, "note", 4, 36) != 4 ||
+            pwrite(descriptor_, size.view().data(), size.size(), 4) != 4)
             std::abort();
     }
     int descriptor() const { return descriptor_; }
@@ -98,36 +104,57 @@ double median(std::vector<double> times)
     return *middle;
 }
 
-/// 1 KiB put behind the samples, beside one write of as many bytes by the system call: both on an open file.
+/// 1 KiB put behind the samples of files that were just opened and last changed a while ago, beside the calls that
+/// cannot be left out (is it still the file that was opened, the chunk, the container's size), and beside a single
+/// write; in turns, each on a file of its own.
 void AddBehindSamples(benchmark::State& state)
 {
-    LargeFile file(kDataSize);
-    CAudioFileIO audio(file.ref(), kFileIOReadWrite);
+    constexpr std::size_t count = 150;
+    const std::vector<LargeFile> files(count);
     std::array<std::byte, 8 + kBody.size()> chunk{};
-    double bare = 0, ours = 0;
+    std::array<std::byte, 12> header{};
+    const auto write = [&](int descriptor, const auto& bytes, std::int64_t position) {
+        if (pwrite(descriptor, bytes.data(), bytes.size(), position) != static_cast<ssize_t>(bytes.size()))
+            state.SkipWithError("pwrite failed");
+    };
+    enum Way { ours, threeCalls, onePwrite, ways };
+    std::vector<double> times[ways];
+    std::size_t next = 0;
     for (auto _ : state) {
-        bare += seconds([&] {
-            if (pwrite(file.descriptor(), chunk.data(), chunk.size(), file.length()) != ssize_t{chunk.size()})
-                state.SkipWithError("pwrite failed");
-        });
-        file.restore();
-        ContainerChkExtended header;
-        audio.ReadExtendedFileHeader(header);
-        header.SetSize(file.length() - 8);
-        header.ByteOrder();
-        audio.Write(&header, 0, 12);
-        const double taken = seconds([&] {
-            if (audio.AddChunk(kNote, kBody.data(), kBody.size(), false) != 1)
-                state.SkipWithError("AddChunk failed");
-        });
-        ours += taken;
-        state.SetIterationTime(taken);
-        file.restore();
+        if (next % count == 0) {
+            std::for_each(files.begin(), files.end(), [](const LargeFile& file) { file.restore(); });
+            std::this_thread::sleep_for(std::chrono::milliseconds(3100));
+        }
+        for (std::size_t turn = 0; turn < ways; ++turn) {
+            const auto way = static_cast<Way>((turn + next / ways) % ways);
+            const LargeFile& file = files[next % count + turn];
+            CAudioFileIO audio(file.ref(), kFileIOReadWrite);
+            const platform::OwnedDescriptor bare(open(file.path().c_str(), O_RDWR | O_CLOEXEC));
+            if (pread(bare.get(), header.data(), header.size(), 0) != ssize_t{header.size()})
+                state.SkipWithError("pread failed");
+            times[way].push_back(seconds([&] {
+                struct statx status = {};
+                if (way == ours) {
+                    if (audio.AddChunk(kNote, kBody.data(), kBody.size(), false) != 1)
+                        state.SkipWithError("AddChunk failed");
+                    return;
+                }
+                if (way == threeCalls && statx(bare.get(), "", AT_EMPTY_PATH, STATX_BASIC_STATS, &status) != 0)
+                    state.SkipWithError("statx failed");
+                write(bare.get(), chunk, file.length());
+                if (way == threeCalls)
+                    write(bare.get(), header, 0);
+            }));
+        }
+        next += ways;
+        state.SetIterationTime(times[ours].back());
     }
-    state.counters["bare_us"] = 1e6 * bare / static_cast<double>(state.iterations());
-    state.counters["times_bare"] = ours / bare; // at most 3
+    state.counters["bare_us"] = 1e6 * median(times[threeCalls]);
+    state.counters["median_us"] = 1e6 * median(times[ours]);
+    state.counters["times_bare"] = median(times[ours]) / median(times[threeCalls]); // at most 1.1
+    state.counters["times_pwrite"] = median(times[ours]) / median(times[onePwrite]);
 }
-BENCHMARK(AddBehindSamples)->UseManualTime()->Unit(benchmark::kMicrosecond)->MinTime(1);
+BENCHMARK(AddBehindSamples)->UseManualTime()->Unit(benchmark::kMicrosecond)->Iterations(500);
 
 /// A chunk ahead of the samples, of which there are as many bytes as the argument says: the time must be the same.
 void RemoveAheadOfSamples(benchmark::State& state)

@@ -3,6 +3,7 @@
 
 #include "audiofile/AudioFileHeader.h"
 #include "audiofile/ContainerDescriptions.h"
+#include "audiofile/ContainerEditor.h"
 #include "audiofile/FileWindow.h"
 #include "files/CFileUtil.h"
 #include "media/decoding/ConvertingReader.h"
@@ -10,6 +11,7 @@
 
 #include <algorithm>
 #include <array>
+#include <chrono>
 #include <cstdint>
 #include <cstdio>
 
@@ -23,6 +25,14 @@ bool isWritableTarget(const CFileRef& ref)
     platform::FileStatus status;
     return path != nullptr && platform::systemCalls().pathStatus(path, &status) &&
            status.kind != platform::FileKind::directory;
+}
+
+/// A change within one tick of a file system's clock leaves the time of the one before. The coarsest ticks, those of
+/// FAT, are two seconds.
+bool wasLongAgo(const FileStamp& stamp)
+{
+    const auto now = std::chrono::system_clock::now().time_since_epoch();
+    return now - std::chrono::nanoseconds(stamp.changed) > std::chrono::seconds(3);
 }
 
 using Header = std::array<char, kMaxAudioFileHeaderSize>;
@@ -83,12 +93,16 @@ std::int32_t CAudioFileIO::OpenUndescribed(const CFileRef& ref, unsigned int per
 /// A file that is no audio file is open all the same, and described as far as it was understood.
 void CAudioFileIO::Describe(unsigned int permission)
 {
+    // Asked behind the stamp, ahead of all that is read: what changes from now on has another time.
+    const bool changesShow = (permission & kFileIOMemory) == 0 && IsOpenForWriting() && wasLongAgo(StampAtOpen());
     auto window = std::make_unique<FileWindow>(*this, IsOpenForWriting() ? GetEOF() : LengthAtOpen());
     infoStatus_ = DescribeAudioFile(*window, IsMemoryFile() ? nullptr : URL(), info_);
     readFailure_ = window->failure();
     if ((permission & (kFileIOReadWrite | kFileIOMemory)) == 0) {
         window_ = std::move(window);
         windowStamp_ = StampAtOpen();
+    } else if (changesShow && window->fileLength() == LengthAtOpen()) {
+        KeepEnd(*window);
     }
     const bool singleFloats = info_.bitsPerSample == 32 && info_.floatingPoint;
     sampleFormat_ = singleFloats ? -32 : info_.bitsPerSample;
@@ -100,6 +114,15 @@ void CAudioFileIO::Describe(unsigned int permission)
         };
         headerOption_ = length(false) != info_.dataOffset && length(true) == info_.dataOffset;
     }
+}
+
+/// Where the headers lie in what was read already.
+void CAudioFileIO::KeepEnd(FileWindow& window)
+{
+    window.seal();
+    ContainerEnd end;
+    if (ContainerEditor::findEnd(window, end) == ContainerEditor::kEndFound)
+        endAtOpen_ = std::make_unique<ContainerEnd>(end);
 }
 
 std::int32_t CAudioFileIO::Close()
@@ -121,6 +144,7 @@ void CAudioFileIO::ForgetFile()
 {
     decoder_.reset();
     window_.reset();
+    endAtOpen_.reset();
     info_ = {};
     infoStatus_ = readFailure_ = kStatusOK;
     sampleFormat_ = 0;

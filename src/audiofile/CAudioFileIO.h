@@ -17,6 +17,7 @@
 #include <optional>
 
 class FileWindow;
+struct ContainerEnd;
 
 namespace platform {
 class ConvertingReader;
@@ -39,7 +40,9 @@ struct ContainerExtent {
 };
 
 /// Of a file that is open for reading only, container headers are kept once read, until the file's length or the time
-/// of its last change is another. The description stays that of the time when it was opened.
+/// of its last change is another. Of one that is open for writing they are read anew for every operation; only the
+/// first chunk that is added goes by what opening read, where a change since then would show. The description stays
+/// that of the time when it was opened.
 class KT_EXPORT CAudioFileIO : public CFileIO {
 public:
     CAudioFileIO();
@@ -107,6 +110,9 @@ public:
     /// Removes every chunk of that id (in CAF the first): one ahead of the samples is renamed "free", others are cut
     /// out.
     std::int32_t RemoveChunk(unsigned int id);
+    /// The same as RemoveChunk again and again until nothing goes any more, in linear time in CAF too, where only empty
+    /// ones are left.
+    std::int32_t RemoveAllChunks(unsigned int id);
 
     /// Replaces the positions in an AIFF file's "trns" chunk; everything else in it is kept. False, with nothing
     /// written, when there is no such chunk of at least 76 bytes, for a count below 0 or beyond 178,956,967, and when
@@ -197,12 +203,14 @@ private:
     std::int32_t ReadBody(const FoundChunk& found, std::unique_ptr<char[]>& data);
     std::int32_t OpenUndescribed(const CFileRef& ref, unsigned int permission);
     void Describe(unsigned int permission);
+    void KeepEnd(FileWindow& window);
 
     AudioFileInfo info_;
     std::int32_t infoStatus_ = 0;
     std::int32_t readFailure_ = 0;                        // the one that the description met
     std::unique_ptr<FileWindow> window_;                  // on a file that is open for reading; null otherwise
     FileStamp windowStamp_;                               // of the file when the window was opened
+    std::unique_ptr<ContainerEnd> endAtOpen_;             // while StampAtOpen() is the file's; may be null
     std::unique_ptr<platform::ConvertingReader> decoder_; // of compressed data; null until it is read
     std::int32_t sampleFormat_ = 0;
     bool headerDirty_ = false;

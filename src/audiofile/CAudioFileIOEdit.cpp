@@ -33,7 +33,8 @@ std::int32_t CAudioFileIO::AddChunk(unsigned int id, const void* data, long size
     ContainerEditor editor(*this, info_);
     if (replace && editor.remove(id) != kStatusOK)
         return kNotRemoved;
-    return editor.append(id, BytesView(static_cast<const std::byte*>(data), static_cast<std::size_t>(size)));
+    return editor.append(id, BytesView(static_cast<const std::byte*>(data), static_cast<std::size_t>(size)),
+                         endAtOpen_.get());
 }
 
 std::int32_t CAudioFileIO::AddChunk(const CChunkData& chunk, bool replace)
@@ -51,6 +52,13 @@ std::int32_t CAudioFileIO::RemoveChunk(unsigned int id)
     if (const std::int32_t status = PrepareToEdit(); status != kStatusOK)
         return status;
     return ContainerEditor(*this, info_).remove(id);
+}
+
+std::int32_t CAudioFileIO::RemoveAllChunks(unsigned int id)
+{
+    if (const std::int32_t status = PrepareToEdit(); status != kStatusOK)
+        return status;
+    return ContainerEditor(*this, info_).remove(id, ContainerEditor::OfCAF::all);
 }
 
 std::int32_t CAudioFileIO::PrepareToAppend()

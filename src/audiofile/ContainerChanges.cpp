@@ -42,7 +42,6 @@ ContainerProblem OpenContainer(CAudioFileIO& file, const CFileRef& ref, unsigned
 
 ContainerProblem RemoveChunksFrom(const CFileRef& container, FourCC id, std::int64_t count)
 {
-    // CAudioFileIO removes one chunk at a time from a CAF file, and all at once from others.
     ChunkSurvey left;
     if (ContainerProblem problem = survey(container, id, left))
         return problem;
@@ -52,7 +51,7 @@ ContainerProblem RemoveChunksFrom(const CFileRef& container, FourCC id, std::int
         CAudioFileIO file;
         if (ContainerProblem problem = OpenContainer(file, container, kFileIOReadWrite))
             return problem;
-        if (ContainerProblem problem = ContainerProblem::ofStatus(file.RemoveChunk(id)))
+        if (ContainerProblem problem = ContainerProblem::ofStatus(file.RemoveAllChunks(id)))
             return problem;
         if (ContainerProblem problem = ContainerProblem::ofStatus(file.Close()))
             return problem;

@@ -1,13 +1,13 @@
 #include "audiofile/ContainerEditor.h"
 
 #include "audiofile/FileWindow.h"
-#include "media/containers/ChunkWalk.h"
 #include "platform/core/ByteOrder.h"
 
 #include <algorithm>
 #include <array>
 #include <memory>
 #include <new>
+#include <optional>
 
 namespace {
 
@@ -30,16 +30,9 @@ std::int32_t unlessUnreadable(const FileWindow& window, std::int32_t status)
 
 } // namespace
 
-/// The chunk behind which a new one goes.
-struct ContainerEditor::LastChunk {
-    platform::WalkedChunk chunk;
-    std::int64_t insertion = 0;
-    std::int64_t dataSize = 0; // of the chunk "data"
-};
-
-std::int32_t ContainerEditor::append(FourCC id, BytesView body)
+std::int32_t ContainerEditor::append(FourCC id, BytesView body, const ContainerEnd* atOpen)
 {
-    return isCAF() ? appendToCAF(id, body) : appendToContainer(id, body);
+    return isCAF() ? appendToCAF(id, body) : appendToContainer(id, body, atOpen);
 }
 
 /// At the end of the file, without a pad byte. Kept: a last chunk "data" whose size says "to the end of the file" is
@@ -55,13 +48,10 @@ std::int32_t ContainerEditor::appendToCAF(FourCC id, BytesView body)
     return writeTogether(end, pieces) == kStatusOK ? kAdded : kChunkHeaderFailed;
 }
 
-/// Whether the sizes can be said is known before anything is written.
-std::int32_t ContainerEditor::appendToContainer(FourCC id, BytesView body)
+/// Kept: the container's size decides which chunk is the last, so that in a recording that was cut short, whose size is
+/// still 0, a new chunk goes over the samples; callers who may meet one look before.
+std::int32_t ContainerEditor::findEnd(FileWindow& window, ContainerEnd& end)
 {
-    long long length = 0;
-    if (const std::int32_t status = file_.GetEOF(&length); status != kStatusOK)
-        return status;
-    FileWindow window(file_, length);
     ChunkWalk walk(window, WalkPolicy::asStated);
     if (walk.begin() != kStatusOK)
         return walk.container().traits != nullptr ? kHeaderUnreadable : unlessUnreadable(window, kNoChunkedContainer);
@@ -69,21 +59,40 @@ std::int32_t ContainerEditor::appendToContainer(FourCC id, BytesView body)
         return kNoChunkedContainer;
     if (walk.statedEnd() < 0)
         return kStatusEndOfFile;
-    LastChunk last;
-    if (const std::int32_t status = findLastChunk(walk, last); status != kStatusOK)
-        return status;
-    ContainerChkExtended header = walk.container().header;
+    while (walk.next()) {
+        end.last = walk.chunk();
+        end.insertion = walk.following();
+        if (end.last.id == kData)
+            end.dataSize = end.last.size;
+    }
+    end.header = walk.container().header;
+    return walk.status() == kStatusOK ? kEndFound : walk.status();
+}
 
-    const ContainerChkExtended before = header;
+/// Whether the sizes can be said is known before anything is written.
+std::int32_t ContainerEditor::appendToContainer(FourCC id, BytesView body, const ContainerEnd* atOpen)
+{
+    FileStamp now;
+    if (const std::int32_t status = file_.GetStamp(now); status != kStatusOK)
+        return status;
+    std::optional<ContainerEnd> found;
+    if (atOpen == nullptr || now != file_.StampAtOpen()) {
+        FileWindow window(file_, now.length);
+        if (const std::int32_t status = findEnd(window, found.emplace()); status != kEndFound)
+            return status;
+    }
+    const ContainerEnd& end = found ? *found : *atOpen;
+    const ContainerChkExtended& before = end.header;
+    ContainerChkExtended header = before;
     const auto size = static_cast<std::int64_t>(body.size());
     std::int64_t containerSize = 0;
-    if (__builtin_add_overflow(last.insertion, size + padOf(size), &containerSize) ||
+    if (__builtin_add_overflow(end.insertion, size + padOf(size), &containerSize) ||
         header.SetSize(containerSize) != kStatusOK)
         return kChunkSizeTooLarge;
     if (!header.IsWAVE() && containerSize > kLargestFORM) // its size would be clamped, and the chunk not found again
         return kChunkSizeTooLarge;
     if (header.HasValidDs64() && !before.HasValidDs64()) {
-        header.dataSize = static_cast<std::uint64_t>(last.dataSize);
+        header.dataSize = static_cast<std::uint64_t>(end.dataSize);
         header.sampleCount = static_cast<std::uint64_t>(info_.frames);
     }
     ChkHeader chunk{id, {}};
@@ -92,38 +101,25 @@ std::int32_t ContainerEditor::appendToContainer(FourCC id, BytesView body)
 
     if (before.HasValidDs64() && !header.HasValidDs64() && storeSizesOutright(before) != kStatusOK)
         return kHeaderNotWritten;
-    if (storeLastSize(last, header) != kStatusOK)
+    if (storeLastSize(end, header) != kStatusOK)
         return kHeaderNotWritten;
     chunk.ByteOrder(header);
-    if (const std::int32_t status = writeChunk(last.insertion, chunk, body, padOf(size) != 0); status != kStatusOK)
+    if (const std::int32_t status = writeChunk(end.insertion, chunk, body, padOf(size) != 0); status != kStatusOK)
         return status;
     return writeContainerHeader(header) == kStatusOK ? kAdded : kHeaderNotWritten;
 }
 
-/// Kept: the container's size decides which chunk is the last, so that in a recording that was cut short, whose size is
-/// still 0, a new chunk goes over the samples; callers who may meet one look before.
-std::int32_t ContainerEditor::findLastChunk(ChunkWalk& walk, LastChunk& last)
-{
-    while (walk.next()) {
-        last.chunk = walk.chunk();
-        last.insertion = walk.following();
-        if (last.chunk.id == kData)
-            last.dataSize = last.chunk.size;
-    }
-    return walk.status();
-}
-
 /// Repairs a last chunk whose size is stale.
-std::int32_t ContainerEditor::storeLastSize(LastChunk& last, ContainerChkExtended& header)
+std::int32_t ContainerEditor::storeLastSize(const ContainerEnd& end, ContainerChkExtended& header)
 {
-    ChkHeader chunk{last.chunk.id, last.chunk.field};
-    const auto body = static_cast<std::int64_t>(last.chunk.body);
+    ChkHeader chunk{end.last.id, end.last.field};
+    const auto body = static_cast<std::int64_t>(end.last.body);
     std::int64_t extent = 0;
-    const bool overflows = __builtin_add_overflow(body + padOf(last.chunk.size), last.chunk.size, &extent);
-    if (!overflows && extent == last.insertion)
+    const bool overflows = __builtin_add_overflow(body + padOf(end.last.size), end.last.size, &extent);
+    if (!overflows && extent == end.insertion)
         return kStatusOK;
-    chunk.SetSize(last.insertion - body, header);
-    return writeChunkHeader(static_cast<std::int64_t>(last.chunk.position), chunk, header);
+    chunk.SetSize(end.insertion - body, header);
+    return writeChunkHeader(static_cast<std::int64_t>(end.last.position), chunk, header);
 }
 
 /// Pieces that follow each other in the file, in one system call when they are small.
@@ -199,7 +195,7 @@ std::int32_t ContainerEditor::storeSizesOutright(const ContainerChkExtended& hea
 
 /// One pass finds all of them, the cuts are made together, and what stands ahead of the samples is renamed at last: the
 /// same bytes as finding and removing the last one again and again, in linear time.
-std::int32_t ContainerEditor::remove(FourCC id)
+std::int32_t ContainerEditor::remove(FourCC id, OfCAF which)
 {
     long long length = 0;
     if (const std::int32_t status = file_.GetEOF(&length); status != kStatusOK)
@@ -219,8 +215,8 @@ std::int32_t ContainerEditor::remove(FourCC id)
     });
     std::vector<Extent> holes(firstCut, found.end());
     found.erase(firstCut, found.end());
-    if (isCAF() && holes.size() > 1)
-        holes.resize(1); // Kept: of a CAF file's only one is cut out
+    if (isCAF() && which == OfCAF::first && holes.size() > 1)
+        holes.resize(1); // Kept: hosts have one at a time cut out
     std::int32_t status = holes.empty() ? kStatusOK : cutOut(holes);
     if (status == kStatusOK && !holes.empty() && !isCAF())
         status = shrink(header, holes);
@@ -254,13 +250,8 @@ std::int32_t ContainerEditor::findAll(FileWindow& window, FourCC id, std::vector
 std::int32_t ContainerEditor::cutOut(const std::vector<Extent>& holes)
 {
     std::int64_t to = holes.front().position;
-    std::int32_t status = kStatusOK;
     std::int64_t aheadOfSamples = 0;
-    for (std::size_t i = 0; i + 1 < holes.size() && status == kStatusOK; ++i) {
-        const std::int64_t kept = holes[i + 1].position - holes[i].next;
-        status = movePiece(holes[i].next, to, kept);
-        to += kept;
-    }
+    std::int32_t status = closeUp(holes, to);
     if (status == kStatusOK)
         status = file_.BlockMove(holes.back().next, to);
     for (const Extent& hole : holes) {
@@ -274,23 +265,36 @@ std::int32_t ContainerEditor::cutOut(const std::vector<Extent>& holes)
     return status;
 }
 
-/// Towards the start of the file.
-std::int32_t ContainerEditor::movePiece(std::int64_t from, std::int64_t to, std::int64_t count)
+/// Moves what lies between the first hole and the last towards the start of the file, to `to`, which goes behind it.
+/// What lies between many is moved together.
+std::int32_t ContainerEditor::closeUp(const std::vector<Extent>& holes, std::int64_t& to)
 {
     constexpr std::int64_t largestPiece = 1048576;
-    const auto capacity = static_cast<std::size_t>(std::min(count, largestPiece));
+    const std::int64_t end = holes.back().position;
+    std::int64_t position = holes.front().next;
+    if (position >= end)
+        return kStatusOK;
+    const auto capacity = static_cast<std::size_t>(std::min(end - position, largestPiece));
     const std::unique_ptr<char[]> buffer(new (std::nothrow) char[capacity]);
     if (!buffer)
         return kStatusOutOfMemory;
-    std::int32_t status = kStatusOK;
-    for (std::int64_t done = 0; done < count && status == kStatusOK;) {
-        const auto piece = static_cast<long>(std::min(count - done, largestPiece));
-        status = file_.Read(buffer.get(), from + done, piece, nullptr);
-        if (status == kStatusOK)
-            status = file_.Write(buffer.get(), to + done, piece);
-        done += piece;
+    for (auto hole = holes.begin() + 1; position < end;) {
+        const std::int64_t start = position, behind = std::min(end, start + largestPiece);
+        if (const auto status = file_.Read(buffer.get(), start, static_cast<long>(behind - start), nullptr);
+            status != kStatusOK)
+            return status;
+        char* filled = buffer.get();
+        while (position < behind) {
+            const std::int64_t keptEnd = std::min(hole->position, behind);
+            filled = std::copy_n(buffer.get() + (position - start), keptEnd - position, filled);
+            position = keptEnd == hole->position ? hole++->next : keptEnd;
+        }
+        const auto kept = static_cast<long>(filled - buffer.get());
+        if (const std::int32_t status = file_.Write(buffer.get(), to, kept); status != kStatusOK)
+            return status;
+        to += kept;
     }
-    return status;
+    return kStatusOK;
 }
 
 /// Stores the container's size after a cut.

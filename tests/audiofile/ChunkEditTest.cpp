@@ -8,6 +8,9 @@
 
 #include <gtest/gtest.h>
 
+#include <chrono>
+#include <fstream>
+
 using namespace std::string_view_literals;
 
 namespace {
@@ -57,6 +60,64 @@ TEST(ChunkEdit, AnAddedChunkStandsBehindTheLast)
     }
 }
 
+/// What opening read is believed where a change since then would show, and nowhere else: here another program gave the
+/// container the size that it had before its last chunk, which leaves the file as long as it was.
+TEST(ChunkEdit, AddingGoesByWhatOpeningReadOnlyWhereChangesShow)
+{
+    static std::int64_t stamp;
+    const std::int64_t now = std::chrono::nanoseconds(std::chrono::system_clock::now().time_since_epoch()).count();
+    const std::int64_t longAgo = now - 3'600'000'000'000;
+    const Bytes before = wave().chunk("old ", "12").bytes(), shrunk = wave().bytes();
+    const struct {
+        const char* what;
+        std::int64_t atOpen, atAdding;
+        bool isShrunk, isRead;
+    } cases[] = {{"unchanged", longAgo, longAgo, false, false},
+                 {"changed since", longAgo, now, true, true},
+                 {"changed within the tick of the change before", now, now, true, true},
+                 {"a clock that is ahead", now + 3'600'000'000'000, now + 3'600'000'000'000, true, true}};
+    const TemporaryFolder folder;
+    for (const auto& each : cases) {
+        SCOPED_TRACE(each.what);
+        FaultInjector calls;
+        static const platform::SystemCalls intercepted = platform::systemCalls();
+        platform::systemCalls().openFileWithoutLinks = [](const char*, platform::OpenFor, platform::FileStatus*) {
+            errno = ENOSYS;
+            return -1;
+        };
+        platform::systemCalls().openFile = [](const char* path, platform::OpenFor access,
+                                              platform::FileStatus* status) {
+            platform::FileStatus found;
+            const int descriptor = intercepted.openFile(path, access, &found);
+            found.changed = stamp;
+            if (status != nullptr)
+                *status = found;
+            return descriptor;
+        };
+        platform::systemCalls().status = [](int descriptor, platform::FileStatus* status) {
+            const bool result = intercepted.status(descriptor, status);
+            status->changed = stamp;
+            return result;
+        };
+        const std::string path = folder.write("a.wav", before);
+        stamp = each.atOpen;
+        CAudioFileIO file(CFileRef(path.c_str(), false), kFileIOReadWrite);
+        if (each.isShrunk)
+            std::fstream(path, std::ios::in | std::ios::out | std::ios::binary)
+                .write(reinterpret_cast<const char*>(shrunk.data()), 8);
+        stamp = each.atAdding;
+        const int reads = calls.calls(Call::pread);
+        EXPECT_EQ(add(file, "note", "abcd"), 1);
+        EXPECT_EQ(calls.calls(Call::pread) > reads, each.isRead);
+        EXPECT_EQ(add(file, "next", "ef"), 1); // by what the file is now, whatever its stamp says
+        file.Close();
+        EXPECT_EQ(textOf(readFile(path)), textOf((each.isShrunk ? wave() : wave().chunk("old ", "12"))
+                                                     .chunk("note", "abcd")
+                                                     .chunk("next", "ef")
+                                                     .bytes()));
+    }
+}
+
 TEST(ChunkEdit, Remove)
 {
     const auto ahead = [](const char* id) {
@@ -102,20 +163,41 @@ TEST(ChunkEdit, Remove)
 
 TEST(ChunkEdit, ManyOfAnIdAreRemovedInLinearTime)
 {
-    constexpr int count = 50000;
-    ContainerBuilder builder = wave();
-    for (int i = 0; i < count; ++i)
-        builder.chunk("note", "1").chunk("LIST", "2");
-    const TemporaryFolder folder;
-    CAudioFileIO file(CFileRef(folder.write("many.wav", builder.bytes()).c_str(), false), kFileIOReadWrite);
-    FaultInjector faults;
-    EXPECT_EQ(file.RemoveChunk(fourCC("note")), 0);
-    EXPECT_LE(faults.calls(Call::pread) + faults.calls(Call::pwrite), 3 * count);
-    EXPECT_EQ(faults.calls(Call::ftruncate), 1);
-    EXPECT_EQ(file.FindChunk(fourCC("note")), std::nullopt);
-    int lists = 0;
-    file.ForEachChunk([&](const ChunkEntry& chunk) { return lists += chunk.id == fourCC("LIST"), true; });
-    EXPECT_EQ(lists, count);
+    constexpr int count = 120'000; // more than is moved at a time
+    for (ContainerBuilder builder : {wave(), ContainerBuilder("caff").format().chunk("data", "1234")}) {
+        ContainerBuilder left = builder;
+        for (int i = 0; i < count; ++i) {
+            const std::string text = std::to_string(i);
+            builder.chunk("note", "1").chunk("LIST", text);
+            left.chunk("LIST", text);
+        }
+        const TemporaryFolder folder;
+        const std::string path = folder.write("many", builder.bytes());
+        CAudioFileIO file(CFileRef(path.c_str(), false), kFileIOReadWrite);
+        FaultInjector faults;
+        EXPECT_EQ(file.RemoveAllChunks(fourCC("note")), 0);
+        EXPECT_LE(faults.calls(Call::pread) + faults.calls(Call::pwrite), count / 10);
+        EXPECT_EQ(faults.calls(Call::ftruncate), 1);
+        file.Close();
+        EXPECT_TRUE(readFile(path) == left.bytes());
+    }
+}
+
+TEST(ChunkEdit, AllAtOnceLeaveWhatOneByOneLeave)
+{
+    const auto caf = [] { return ContainerBuilder("caff").format(); };
+    const Bytes cases[] = {caf().chunk("note", "1").chunk("note", "22").chunk("data", "abcdef").bytes(),
+                           caf().chunk("data", "ab").chunk("note", "1").chunk("note", "").chunk("note", "333").bytes(),
+                           caf().chunk("note", "1").chunk("data", "ab").chunk("note", "2").chunk("x   ", "3").bytes(),
+                           caf().chunk("data", "ab").chunk("note", "1").chunk("note", "22", 5).bytes(),
+                           wave().chunk("note", "odd").chunk("LIST", "x").chunk("note", "").bytes()};
+    for (const Bytes& before : cases) {
+        MemoryAudioFile atOnce(before), oneByOne(before);
+        EXPECT_EQ(atOnce.RemoveAllChunks(fourCC("note")), 0);
+        for (int i = 0; i < 5; ++i)
+            EXPECT_EQ(oneByOne.RemoveChunk(fourCC("note")), 0);
+        EXPECT_EQ(textOf(contentOf(atOnce)), textOf(contentOf(oneByOne)));
+    }
 }
 
 TEST(ChunkEdit, FailuresSayWhatWasNotWritten)

@@ -21,6 +21,9 @@ public:
     /// `length` is that of the file, asked for once.
     HeaderWindow(const ByteSource& file, std::uint64_t length) : file_(file), length_(length) {}
 
+    /// From now on nothing is read: a read of what is not held fails.
+    void seal() { isSealed_ = true; }
+
     std::uint64_t length() const { return length_; }
     /// That of the first read that failed; kStatusOK until then. A file whose bytes cannot be read has not ended.
     std::int32_t failure() const { return failure_; }
@@ -106,7 +109,8 @@ private:
     void load(std::byte* to, std::uint64_t from, std::size_t capacity, std::size_t& got)
     {
         const auto count = static_cast<std::size_t>(std::min<std::uint64_t>(capacity, length_ - from));
-        const std::int32_t status = file_.readSome(from, to, count, got);
+        got = 0;
+        const std::int32_t status = isSealed_ ? std::int32_t{kStatusIOError} : file_.readSome(from, to, count, got);
         if (status == kStatusOK)
             return;
         reason_ = status;
@@ -116,6 +120,7 @@ private:
 
     const ByteSource& file_;
     std::uint64_t length_;
+    bool isSealed_ = false;
     std::int32_t reason_ = kStatusEndOfFile;
     std::int32_t failure_ = kStatusOK;
     Piece<kStartSize> start_;

@@ -289,8 +289,14 @@ TEST_F(FaultTest, WithoutTicketsAccessStillExcludesAndEnds)
 TEST_F(FaultTest, WhoWaitsStandsBehindTheLastTicketWhateverGapsTheKilledLeft)
 {
     const ItemWindow window(CoordinatedItem(itemURL()).key());
-    const std::vector<std::int64_t> sets[] = {{0},       {0, 1, 2, 3, 4, 5, 6},          {0, 5, 6},         {3},
-                                              {0, 1000}, {2, 4, 8, 9, 200, 4000, 70000}, {kTicketCount - 2}};
+    const std::vector<std::int64_t> sets[] = {{0},
+                                              {0, 1, 2, 3, 4, 5, 6},
+                                              {0, 3, 5},
+                                              {3},
+                                              {0, 1000},
+                                              {0, 2, 5, 9, 11},
+                                              {2, 4, 8, 9, 200, 4000, 70000},
+                                              {kTicketCount - 2}};
     for (const auto& taken : sets)
         for (const std::int64_t tickets : {kWriterTickets, kReaderTickets}) {
             AgentProcess holder(folder()), writer(folder());

@@ -8,8 +8,10 @@
 
 #include <gtest/gtest.h>
 
+#include <fcntl.h>
 #include <sched.h>
 #include <sys/mount.h>
+#include <sys/stat.h>
 #include <sys/statvfs.h>
 #include <sys/wait.h>
 #include <unistd.h>
@@ -97,6 +99,9 @@ TEST(Volumes, NetworkFileSystemsGoByTheirNames)
 // In a mount table of its own, which takes a process of its own.
 TEST(Volumes, MountsAreTakenForWhatTheyAre)
 {
+    struct statx root {};
+    if (::statx(AT_FDCWD, "/", 0, STATX_MNT_ID, &root) == 0 && root.stx_mnt_id == 0)
+        GTEST_SKIP() << "an emulator that tells no mount's id";
     const TemporaryFolder folder;
     for (const char* name : {"lower", "upper", "work", "merged", "bound"})
         fs::create_directory(folder / name);

@@ -12,6 +12,7 @@
 #include <random>
 #include <spawn.h>
 #include <string>
+#include <sys/resource.h>
 #include <sys/wait.h>
 #include <vector>
 
@@ -140,6 +141,87 @@ BENCHMARK(BM_SeekInHour)
     ->DenseRange(0, 1)
     ->UseManualTime()
     ->Iterations(500)
+    ->Unit(benchmark::kMillisecond);
+
+/// Half an hour of stereo noise as 16-bit WAVE at 44.1 kHz; made once and removed when the process ends.
+class HalfHour {
+public:
+    static const HalfHour& shared()
+    {
+        static const HalfHour file;
+        return file;
+    }
+    /// The command's words with "%" for the folder.
+    int run(std::string command) const
+    {
+        for (std::size_t at; (at = command.find('%')) != std::string::npos;)
+            command.replace(at, 1, folder_.string());
+        return std::system((command + " >/dev/null 2>&1 </dev/null").c_str());
+    }
+
+private:
+    HalfHour()
+    {
+        std::string pattern = std::filesystem::temp_directory_path() / "ktfiles-bench-XXXXXX";
+        folder_ = mkdtemp(pattern.data());
+        if (run("sox -n -r 44100 -c 2 -b 16 %/half.wav synth 1800 pinknoise vol 0.5") != 0)
+            std::abort();
+    }
+    ~HalfHour() { std::filesystem::remove_all(folder_); }
+
+    std::filesystem::path folder_;
+};
+
+double processorTimeOfChildren()
+{
+    rusage used{};
+    getrusage(RUSAGE_CHILDREN, &used);
+    const auto seconds = [](const timeval& time) {
+        return static_cast<double>(time.tv_sec) + 1e-6 * static_cast<double>(time.tv_usec);
+    };
+    return seconds(used.ru_utime) + seconds(used.ru_stime);
+}
+
+/// Half an hour to 24-bit AIFF, and to 48 kHz, by the command beside sox and ffmpeg, in turns. Ours is committed to
+/// storage at the end, theirs is not.
+void BM_DecodeHalfHour(benchmark::State& state)
+{
+    const bool toAIFF = state.range(0) == 0;
+    const std::string commands[] = {std::string(KTFILES_COMMAND) +
+                                        (toAIFF ? " decode -q --force %/half.wav --bits 24 -o %/ours.aiff"
+                                                : " decode -q --force %/half.wav --rate 48000 -o %/ours.wav"),
+                                    toAIFF ? "sox %/half.wav -b 24 %/sox.aiff" : "sox %/half.wav -r 48000 %/sox.wav",
+                                    toAIFF ? "ffmpeg -nostdin -y -i %/half.wav -c:a pcm_s24be %/ffmpeg.aiff"
+                                           : "ffmpeg -nostdin -y -i %/half.wav -ar 48000 %/ffmpeg.wav"};
+    std::vector<double> wall[3], processor[3];
+    for (auto _ : state)
+        for (std::size_t i = 0; i < 3; ++i) {
+            const double before = processorTimeOfChildren();
+            wall[i].push_back(seconds([&] {
+                if (HalfHour::shared().run(commands[i]) != 0)
+                    state.SkipWithError("a command failed");
+            }));
+            processor[i].push_back(processorTimeOfChildren() - before);
+            if (i == 0)
+                state.SetIterationTime(wall[i].back());
+        }
+    const auto median = [](std::vector<double> times) {
+        const auto middle = times.begin() + static_cast<std::ptrdiff_t>(times.size() / 2);
+        std::nth_element(times.begin(), middle, times.end());
+        return *middle;
+    };
+    state.counters["cpu_s"] = median(processor[0]);
+    state.counters["cpu_of_sox"] = median(processor[0]) / median(processor[1]);    // to AIFF at most 0.6
+    state.counters["cpu_of_ffmpeg"] = median(processor[0]) / median(processor[2]); // to 48 kHz at most 1.2
+    state.counters["wall_of_sox"] = median(wall[0]) / median(wall[1]);
+    state.counters["wall_of_ffmpeg"] = median(wall[0]) / median(wall[2]);
+    state.SetLabel(toAIFF ? "to 24-bit AIFF" : "to 48 kHz");
+}
+BENCHMARK(BM_DecodeHalfHour)
+    ->ArgName("kind")
+    ->DenseRange(0, 1)
+    ->UseManualTime()
+    ->Iterations(5)
     ->Unit(benchmark::kMillisecond);
 
 void run(const char* program)

@@ -242,8 +242,10 @@ TEST(XStream, AtAnotherRatePlacesAndCountsAreOfThatRate)
     XStreamDescription client = floats(1);
     client.sampleRate = 48000;
     {
-        const FakeDecoder::NoModule nothing;
-        const Stream refused(path, 0, &client);
+        const FakeDecoder::NoModule nothing; // which only unusual ratios need
+        XStreamDescription unusual = client;
+        unusual.sampleRate = 44099;
+        const Stream refused(path, 0, &unusual);
         EXPECT_EQ(refused.status, 0x666D743F);
         EXPECT_EQ(refused.handle, nullptr);
     }

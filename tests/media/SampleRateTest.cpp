@@ -2,6 +2,7 @@
 // they were come to.
 #include "ReaderFrames.h"
 #include "media/decoding/DecoderModule.h"
+#include "media/decoding/PolyphaseSums.h"
 #include "support/FakeDecoder.h"
 #include "support/Programs.h"
 
@@ -132,15 +133,18 @@ TEST_F(SampleRate, FramesStandAtTheirTimesAndAreCountedUpToTheEnd)
 TEST_F(SampleRate, ASineComesBackAndLevelsStay)
 {
     constexpr std::size_t frames = 88200;
-    auto reader = readerOf(folder, 44100, 1, frames, sine(1000, 44100));
-    ASSERT_EQ(reader->setClientFormat(StreamDescription::packedPCM(48000, 1, kFloats)), 0);
-    const auto there = readFrom<float>(*reader, 0, 96000);
-    EXPECT_GT(qualityOf(there, 1000, 48000), 120);
-    reader = readerOf(folder, 48000, 1, there.size(), [&](std::size_t frame, int) { return there[frame]; });
-    ASSERT_EQ(reader->setClientFormat(StreamDescription::packedPCM(44100, 1, kFloats)), 0);
-    const auto back = readFrom<float>(*reader, 0, frames);
-    ASSERT_EQ(back.size(), frames);
-    EXPECT_GT(qualityOf(back, 1000, 44100), 120);
+    std::unique_ptr<ConvertingReader> reader;
+    for (const double hertz : {1000.0, 10007.0, 19001.0}) {
+        reader = readerOf(folder, 44100, 1, frames, sine(hertz, 44100));
+        ASSERT_EQ(reader->setClientFormat(StreamDescription::packedPCM(48000, 1, kFloats)), 0);
+        const auto there = readFrom<float>(*reader, 0, 96000);
+        EXPECT_GT(qualityOf(there, hertz, 48000), 120);
+        reader = readerOf(folder, 48000, 1, 96000, sine(hertz, 48000));
+        ASSERT_EQ(reader->setClientFormat(StreamDescription::packedPCM(44100, 1, kFloats)), 0);
+        const auto back = readFrom<float>(*reader, 0, frames);
+        ASSERT_EQ(back.size(), frames);
+        EXPECT_GT(qualityOf(back, hertz, 44100), 120);
+    }
 
     for (const double rate : {48000.0, 22050.0, 44099.0}) {
         reader = readerOf(folder, 44100, 1, 20000, [](std::size_t, int) { return 0.5; });
@@ -153,6 +157,26 @@ TEST_F(SampleRate, ASineComesBackAndLevelsStay)
     ASSERT_EQ(reader->setClientFormat(StreamDescription::packedPCM(44100, 1, kFloats)), 0);
     for (const float level : readFrom<float>(*reader, 1000, 70000))
         ASSERT_NEAR(level, 0, 1e-5);
+}
+
+TEST(PolyphaseSums, OfVectorsAreThoseOfThePlainLoop)
+{
+    constexpr std::size_t taps = 48, phases = 5, stride = 4000, frames = 300;
+    std::mt19937 random(3);
+    std::uniform_real_distribution<float> any(-1, 1);
+    std::vector<float> filters(taps * phases), samples(stride * 5);
+    std::generate(filters.begin(), filters.end(), [&] { return any(random); });
+    std::generate(samples.begin(), samples.end(), [&] { return any(random); });
+    for (const std::size_t channels : {1U, 2U, 3U, 5U})
+        for (const std::size_t step : {3U, 5U, 64U}) {
+            std::vector<float> plain(frames * channels), fast(plain.size());
+            PolyphaseRun run{filters.data(), taps,   phases,   step,         2,
+                             samples.data(), stride, channels, plain.data(), frames};
+            runPolyphasePlain(run);
+            run.to = fast.data();
+            runPolyphase(run);
+            EXPECT_TRUE(areSame(plain, fast.data())) << channels << " channels, step " << step;
+        }
 }
 
 TEST_F(SampleRate, SeeksGiveBitForBitWhatAFullReadGives)

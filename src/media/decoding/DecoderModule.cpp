@@ -1,5 +1,6 @@
 #include "media/decoding/DecoderModule.h"
 
+#include "media/decoding/PolyphaseResampler.h"
 #include "platform/LoadedModule.h"
 #include "platform/core/Status.h"
 
@@ -73,7 +74,10 @@ std::unique_ptr<Resampler> makeResampler(std::uint32_t channels, double fromRate
     };
     std::unique_ptr<Resampler> resampler;
     status = kStatusOK;
-    if (isRate(fromRate) && isRate(toRate) && channels <= Resampler::kMaxChannels) {
+    if (isRate(fromRate) && isRate(toRate))
+        resampler = PolyphaseResampler::make(channels, static_cast<std::uint32_t>(fromRate),
+                                             static_cast<std::uint32_t>(toRate));
+    if (!resampler && isRate(fromRate) && isRate(toRate) && channels <= Resampler::kMaxChannels) {
         const DecoderModule* module = decoderModule();
         if (module == nullptr) {
             failWithoutModule(status, error, "another sample rate needs");

@@ -16,6 +16,8 @@ public:
 
     /// Nothing to do: frames can be read where they are wanted.
     bool isCopy() const { return road_ == Road::copy; }
+    /// Floats may be NaN or infinite; integers are neither.
+    bool mayGiveNoNumbers() const { return from_.isFloat; }
     /// How many frames are converted at a time.
     std::size_t piece() const { return piece_; }
     /// `frames` is at most piece(); `from` and `to` do not overlap. `to` is aligned for floats when it is to hold them.

@@ -5,6 +5,7 @@
 #include <algorithm>
 #include <cmath>
 #include <numeric>
+#include <span>
 #include <utility>
 
 namespace platform {
@@ -74,14 +75,15 @@ std::int32_t ResamplingDecoder::feed()
             return status;
         frames = there > 0 ? there : frames;
     }
-    const auto end = piece_.begin() + static_cast<std::ptrdiff_t>(std::size_t{frames} * frameFormat_.channelsPerFrame);
+    const std::span<float> piece = std::span(piece_).first(std::size_t{frames} * frameFormat_.channelsPerFrame);
     if (there > 0)
         converter_.convert(raw_.data(), reinterpret_cast<std::byte*>(piece_.data()), there);
     else
-        std::fill(piece_.begin(), end, 0.0F);
+        std::fill(piece.begin(), piece.end(), 0.0F);
     // What is no number would spread over all that the filter reaches.
-    std::replace_if(
-        piece_.begin(), end, [](float sample) { return !std::isfinite(sample); }, 0.0F);
+    if (converter_.mayGiveNoNumbers())
+        std::replace_if(
+            piece.begin(), piece.end(), [](float sample) { return !std::isfinite(sample); }, 0.0F);
     return resampler_->convert(piece_.data(), frames, dropped_.data(), none);
 }
 

@@ -12,7 +12,6 @@ extern "C" {
 #include <algorithm>
 #include <bit>
 #include <cmath>
-#include <numeric>
 #include <utility>
 
 namespace platform::ffmpeg {
@@ -25,28 +24,21 @@ constexpr int kCrossings = 128;
 constexpr double kKaiserBeta = 12;
 constexpr double kCutoff = 0.95;
 
-// A filter for each phase of the ratio makes every output frame exact. Where that were more than this many
-// coefficients, there are 1,024 phases, and each frame is the line between two of them, at its exact time.
-constexpr std::uint64_t kMaxExactCoefficients = 1 << 20;
-constexpr std::uint32_t kInterpolatedPhases = 1024;
+// Ratios with few phases have a filter for each of them (media/decoding/PolyphaseResampler.h). Of the others each frame
+// is the line between two of these many, at its exact time.
+constexpr std::uint32_t kPhases = 1024;
 constexpr std::uint64_t kMaxCoefficients = 1 << 24; // of 32 bits
 
 /// How the library is to build its filter.
 struct Filter {
     std::uint64_t taps;
-    std::uint32_t phases;
-    bool isExact;
 
     Filter(std::uint32_t fromRate, std::uint32_t toRate)
     {
         const double factor = std::min(toRate * kCutoff / fromRate, 1.0);
         taps = static_cast<std::uint64_t>(std::ceil(kCrossings / factor)) + 1; // an even number of them
-        const std::uint32_t exactPhases = toRate / std::gcd(fromRate, toRate);
-        isExact = exactPhases <= kInterpolatedPhases || exactPhases * taps <= kMaxExactCoefficients;
-        phases = isExact ? exactPhases : kInterpolatedPhases;
     }
-    bool isReasonable() const { return phases * taps <= kMaxCoefficients; }
-    int phaseShift() const { return static_cast<int>(std::bit_width(std::max(phases, kInterpolatedPhases) - 1)); }
+    bool isReasonable() const { return kPhases * taps <= kMaxCoefficients; }
 };
 
 struct SwrDeleter {
@@ -83,7 +75,7 @@ private:
     std::uint32_t reach_;
 };
 
-int setOptions(SwrContext* context, const Filter& filter)
+int setOptions(SwrContext* context)
 {
     int error = 0;
     const auto set = [&](const char* name, std::int64_t value) {
@@ -91,9 +83,9 @@ int setOptions(SwrContext* context, const Filter& filter)
             error = av_opt_set_int(context, name, value, 0);
     };
     set("filter_size", kCrossings);
-    set("phase_shift", filter.phaseShift());
+    set("phase_shift", std::bit_width(kPhases - 1));
     set("exact_rational", 1);
-    set("linear_interp", filter.isExact ? 0 : 1);
+    set("linear_interp", 1);
     set("filter_type", SWR_FILTER_TYPE_KAISER);
     if (error >= 0)
         error = av_opt_set_double(context, "kaiser_beta", kKaiserBeta, 0);
@@ -120,7 +112,7 @@ std::unique_ptr<Resampler> makeRateConverter(std::uint32_t channels, std::uint32
                                     AV_SAMPLE_FMT_FLT, static_cast<int>(fromRate), 0, nullptr);
     SwrOwner context(made);
     if (error >= 0)
-        error = setOptions(context.get(), filter);
+        error = setOptions(context.get());
     if (error >= 0)
         error = swr_init(context.get());
     status = statusOf(error);

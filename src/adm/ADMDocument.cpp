@@ -117,7 +117,7 @@ ADMElement* ADMDocument::find(std::string_view identifier, std::string_view pref
 
 void ADMDocument::expectADMElementRef(std::string_view identifier, std::string_view typePrefix)
 {
-    withTableOf(*this, typePrefix, [&](auto& table) { table.prefetch(identifier); });
+    withTableOf(*this, typePrefix, [&](const auto& table) { table.prefetch(identifier); });
 }
 
 /// Finds for one element after the other; knows which, so that a problem can be told with its place.
@@ -145,6 +145,8 @@ public:
     {
         document_.expectADMElementRef(identifier, typePrefix);
     }
+
+    bool findsClassesOfPrefixes() const override { return true; }
 
 private:
     ADMDocument& document_;

@@ -73,6 +73,8 @@ public:
     ADMElement* findADMElementRef(std::optional<std::string_view> identifier,
                                   std::optional<std::string_view> typePrefix = {}) override;
     void expectADMElementRef(std::string_view identifier, std::string_view typePrefix) override;
+    /// A derived class whose look-up gives others must say so.
+    bool findsClassesOfPrefixes() const override { return true; }
 
     platform::InputStream* inputStream() const { return inputStream_.get(); }
     /// Null unless a parse runs.

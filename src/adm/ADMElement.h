@@ -19,6 +19,8 @@ public:
     /// MissingDefinition.
     virtual ADMElement* findADMElementRef(std::optional<std::string_view> identifier,
                                           std::optional<std::string_view> typePrefix = {}) = 0;
+    /// Whether what it finds for a prefix is always of the class that the prefix names, so that nobody need ask it.
+    virtual bool findsClassesOfPrefixes() const { return false; }
     /// That the ID will be looked for soon: time to ask memory for what lies where it would be found.
     virtual void expectADMElementRef(std::string_view identifier, std::string_view typePrefix);
 };

@@ -37,17 +37,11 @@ public:
         return found == others_.end() ? nullptr : elements_[found->second].get();
     }
 
-    /// Asks memory for the slot that find() will look at first, and for the element that stands in the slot that was
-    /// asked for eight IDs ahead, which is there by now.
-    void prefetch(std::string_view id)
+    /// Asks memory for the slot that find() will look at first.
+    void prefetch(std::string_view id) const
     {
-        if (id.size() > kShortID || lines_.empty())
-            return;
-        const Slot*& expected = expected_[nextExpected_++ % expected_.size()];
-        if (expected != nullptr)
-            __builtin_prefetch(expected->element);
-        expected = &slotAt(firstSlotOf(id) & (slotCount() - 1));
-        __builtin_prefetch(expected);
+        if (id.size() <= kShortID && !lines_.empty())
+            __builtin_prefetch(&slotAt(firstSlotOf(id) & (slotCount() - 1)));
     }
 
     /// One that is already there under this ID is replaced, and the new one takes its place in the order. It lives on
@@ -167,7 +161,6 @@ private:
     }
     void grow()
     {
-        expected_ = {};
         const std::vector<Line> before =
             std::exchange(lines_, std::vector<Line>(std::max<std::size_t>(8, 2 * lines_.size())));
         for (const Line& line : before)
@@ -177,9 +170,7 @@ private:
     }
 
     Owners elements_;
-    std::vector<Line> lines_;               // a power of two, at most half of their slots taken
-    std::array<const Slot*, 8> expected_{}; // by prefetch(), null until then
-    std::size_t nextExpected_ = 0;
+    std::vector<Line> lines_;                                  // a power of two, at most half of their slots taken
     std::map<std::string, std::uint32_t, std::less<>> others_; // long IDs, and those that found no slot
     Owners replaced_;
 };

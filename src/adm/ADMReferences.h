@@ -15,7 +15,14 @@
 namespace adm {
 
 /// So many look-ups ahead of one it is told what will be looked for: each waits for memory otherwise.
-inline constexpr std::size_t kAnnounced = 16;
+inline constexpr std::size_t kAnnounced = 8;
+
+/// What a resolver found for the prefix of this class. A cast that asks the element would wait for its memory.
+template <class Element>
+Element* elementAs(ADMElement* found, const ADMElementResolver& resolver)
+{
+    return resolver.findsClassesOfPrefixes() ? static_cast<Element*>(found) : dynamic_cast<Element*>(found);
+}
 
 } // namespace adm
 
@@ -31,7 +38,7 @@ struct ADMReferenceList {
         for (std::size_t i = 0; i < ids.size(); ++i) {
             if (i + adm::kAnnounced < ids.size())
                 resolver.expectADMElementRef(ids[i + adm::kAnnounced], prefix);
-            elements.push_back(dynamic_cast<Element*>(resolver.findADMElementRef(ids[i], prefix)));
+            elements.push_back(adm::elementAs<Element>(resolver.findADMElementRef(ids[i], prefix), resolver));
         }
     }
     /// What resolve() does not tell of itself.
@@ -50,7 +57,7 @@ struct ADMReference {
 
     void resolve(ADMElementResolver& resolver, std::string_view prefix)
     {
-        element = dynamic_cast<Element*>(resolver.findADMElementRef(id, prefix));
+        element = adm::elementAs<Element>(resolver.findADMElementRef(id, prefix), resolver);
     }
     void announce(ADMElementResolver& resolver, std::string_view prefix) const
     {

@@ -81,7 +81,7 @@ void storeLE(void* to, T value)
     store(to, value, std::endian::little);
 }
 
-/// A `T` of alignment 1, held in the byte order in which it was read until `swap()` reverses it.
+/// A `T` of alignment 1, held in the byte order in which it was read until `turnFields` (ByteOrder.h) turns it.
 template <class T>
 class Packed {
 public:
@@ -93,7 +93,6 @@ public:
         bytes_ = std::bit_cast<Storage>(value);
         return *this;
     }
-    void swap() { *this = byteSwapped(T{*this}); }
 
 private:
     using Storage = std::array<unsigned char, sizeof(T)>;

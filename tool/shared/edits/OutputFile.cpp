@@ -85,7 +85,20 @@ void OutputFile::write(std::string_view bytes)
         if (written < 0 && errno != EINTR)
             failToWrite(errno);
         bytes.remove_prefix(static_cast<std::size_t>(std::max<ssize_t>(written, 0)));
+        letTheDiskBegin(static_cast<std::size_t>(std::max<ssize_t>(written, 0)));
     }
+}
+
+/// The disk works while the rest is made, so that the commit at the end waits for little. What it cannot write is told
+/// by that commit.
+void OutputFile::letTheDiskBegin(std::size_t written)
+{
+    constexpr std::int64_t worthIt = 8 << 20;
+    length_ += static_cast<std::int64_t>(written);
+    if (!file_ || length_ - begun_ < worthIt)
+        return;
+    ::sync_file_range(file_->Descriptor(), begun_, length_ - begun_, SYNC_FILE_RANGE_WRITE);
+    begun_ = length_;
 }
 
 void OutputFile::rewrite(std::int64_t offset, std::string_view bytes)

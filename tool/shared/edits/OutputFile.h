@@ -39,6 +39,7 @@ public:
     void finish();
 
 private:
+    void letTheDiskBegin(std::size_t written);
     platform::OwnedDescriptor openReplaced() const;
     void publish();
     void takePlaceOf(const platform::OwnedDescriptor& replaced);
@@ -47,6 +48,7 @@ private:
     std::string out_, target_, replaced_; // as given, and with symbolic links resolved
     Existing existing_;
     mode_t mode_ = 0;
+    std::int64_t begun_ = 0, length_ = 0;  // of what was written, how much the disk was told of, and all
     std::unique_ptr<CTemporaryFile> file_; // null: it is none
     platform::OwnedDescriptor device_;
 };

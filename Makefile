@@ -34,11 +34,11 @@ stress:
 	@scripts/setup build test
 	@cmake --preset test $(CMAKE_FLAGS) >/dev/null
 	cmake --build --preset test -j $(JOBS) --target test_coordination
-	KTFILES_KILLS=5000 build/test/tests/test_coordination --gtest_filter='KillTest.*'
+	KTFILES_KILLS=5000 build/release/tests/test_coordination --gtest_filter='KillTest.*'
 
 bench:
 	@scripts/build bench
-	build/bench/bench/ktfiles_bench
+	build/release/bench/ktfiles_bench
 
 fuzz:
 	@scripts/build fuzz

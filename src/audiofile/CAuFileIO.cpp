@@ -1,6 +1,7 @@
 #include "audiofile/CAuFileIO.h"
 
 #include "loops/tagging/ChunkIDs.h"
+#include "media/containers/ContainerHeaders.h"
 #include "platform/core/Packed.h"
 #include "platform/core/Status.h"
 
@@ -13,11 +14,10 @@ using platform::AudioFile;
 using platform::StreamDescription;
 
 constexpr std::int32_t kNotLinearPCM = -208;
-constexpr FourCC kWAVE = fourCC("WAVE");
 
-constexpr int kFound = 1;
+constexpr int kChunkFound = 1;
 constexpr int kAdded = 1;
-constexpr int kNotOpen = -1;
+constexpr int kFileNotOpen = -1;
 constexpr int kNoItem = -2;
 constexpr int kItemUnreadable = -3;
 
@@ -191,7 +191,7 @@ bool CAuFileIO::Swapped() const
 int CAuFileIO::FindChunk(long id, CChunkData& chunk)
 {
     if (openMode_ < 0)
-        return kNotOpen;
+        return kFileNotOpen;
     const auto type = static_cast<FourCC>(id);
     std::uint32_t size = 0;
     if (!file_ || file_->userDataSize(type, 0, size) != kStatusOK || size == 0)
@@ -204,26 +204,26 @@ int CAuFileIO::FindChunk(long id, CChunkData& chunk)
     if (!isRead)
         return kItemUnreadable;
     chunk.id = type;
-    return kFound;
+    return kChunkFound;
 }
 
 int CAuFileIO::AddChunk(CChunkData& chunk, unsigned char)
 {
     if (!IsWritable() || chunk.size < 0 || chunk.size > std::int64_t{UINT32_MAX})
-        return kNotOpen;
+        return kFileNotOpen;
     const auto size = static_cast<std::uint32_t>(chunk.size);
-    return file_->setUserData(chunk.id, 0, size, chunk.data.get()) == kStatusOK ? kAdded : kNotOpen;
+    return file_->setUserData(chunk.id, 0, size, chunk.data.get()) == kStatusOK ? kAdded : kFileNotOpen;
 }
 
 std::int32_t CAuFileIO::RemoveChunk(long id)
 {
-    return IsWritable() ? file_->removeUserData(static_cast<FourCC>(id), 0) : kNotOpen;
+    return IsWritable() ? file_->removeUserData(static_cast<FourCC>(id), 0) : kFileNotOpen;
 }
 
 bool CAuFileIO::IsVireoLoop()
 {
     CChunkData chunk;
-    return FindChunk(tagging::kBasicTagging, chunk) == kFound;
+    return FindChunk(tagging::kBasicTagging, chunk) == kChunkFound;
 }
 
 void CAuFileIO::ByteOrder(int& value) const

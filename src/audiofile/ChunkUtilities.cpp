@@ -12,7 +12,7 @@
 namespace {
 
 constexpr char kMetadataExtension[] = "ktmd";
-constexpr std::int32_t kNotFound = -1;
+constexpr std::int32_t kNoChunk = -1;
 constexpr unsigned char kWriting = 0;
 constexpr unsigned char kReading = 1;
 
@@ -97,7 +97,7 @@ std::int32_t readFrom(CAudioFileIO& in, CChunkData& chunk, ChunkTransform transf
 {
     constexpr std::int32_t found = 1;
     if (in.FindChunk(chunk.id, chunk) != found)
-        return kNotFound;
+        return kNoChunk;
     transform(chunk.data.get(), static_cast<long>(chunk.size), kReading);
     return kStatusOK;
 }
@@ -159,7 +159,7 @@ std::int32_t CFileUtilReadData(const CFileRef& file, CChunkData& chunk, const ch
         if (readFrom(in, chunk, transform) == kStatusOK)
             return kStatusOK;
     }
-    return itself.TakesChunks() ? readFrom(itself, chunk, transform) : kNotFound;
+    return itself.TakesChunks() ? readFrom(itself, chunk, transform) : kNoChunk;
 }
 
 std::int32_t CFileUtilRemoveData(const CFileRef& file, const CChunkData& chunk, const char* extension)

@@ -15,20 +15,20 @@ using Kind = ContainerProblem::Kind;
 namespace {
 
 /// How long the first header of a file is that begins so.
-struct Header {
+struct KnownHeader {
     std::string_view start;
     std::uint64_t length;
 };
-constexpr Header kHeaders[] = {{"RIFF", 12}, {"RIFX", 12}, {"RF64", 12}, {"BW64", 12}, {"FORM", 12},
-                               {"CAT ", 12}, {"caff", 8},  {"riff", 40}, {".snd", 24}, {"fLaC", 42}};
+constexpr KnownHeader kKnownHeaders[] = {{"RIFF", 12}, {"RIFX", 12}, {"RF64", 12}, {"BW64", 12}, {"FORM", 12},
+                                         {"CAT ", 12}, {"caff", 8},  {"riff", 40}, {".snd", 24}, {"fLaC", 42}};
 
 bool endsInFirstHeader(FileWindow& window)
 {
     std::array<std::byte, 4> start{};
     if (!window.get(start, 0))
         return false;
-    const auto* const header = std::ranges::find(kHeaders, textOf(BytesView(start)), &Header::start);
-    return header != std::end(kHeaders) && window.length() < header->length;
+    const auto* const header = std::ranges::find(kKnownHeaders, textOf(BytesView(start)), &KnownHeader::start);
+    return header != std::end(kKnownHeaders) && window.length() < header->length;
 }
 
 /// Of an MP4 file, in which a box says where the sound is.

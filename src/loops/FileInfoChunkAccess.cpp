@@ -7,7 +7,7 @@
 #include "platform/String.h"
 #include "platform/core/Status.h"
 
-using Types = VireoLoopFileInfoChunkDataTypes;
+using InfoTypes = VireoLoopFileInfoChunkDataTypes;
 using UserData = VireoLoopUserDataUtils;
 using platform::Dictionary;
 
@@ -20,7 +20,7 @@ constexpr const char* kKeys[] = {VireoLoopFileInfoChunkDataTitleKey, VireoLoopFi
 std::optional<std::string> textIn(std::string_view key, BytesView data)
 {
     if (key == VireoLoopFileInfoChunkDataCommentsKey)
-        return Types::commentStringFromAifCommentChunkData(data);
+        return InfoTypes::commentStringFromAifCommentChunkData(data);
     const std::string_view text = textOf(data);
     const auto valid = platform::String::fromUTF8(text.substr(0, text.find('\0')));
     return valid ? std::optional(valid.utf8()) : std::nullopt;
@@ -41,12 +41,12 @@ void FileInfoCafChunkReader::readChunk()
     });
     // Where the file says none of them the object stays as it is.
     if (auto* info = chunk_.chunkDataOfClass<VireoLoopFileInfoChunkData>()) { // without the archive in between
-        if (Dictionary known = Types::fileInfoChunkDataDictionaryFromCafInformation(information); !known.empty())
+        if (Dictionary known = InfoTypes::fileInfoChunkDataDictionaryFromCafInformation(information); !known.empty())
             info->setDataDictionary(std::move(known));
         return;
     }
     const auto archive = platform::archiveDictionary(information);
-    if (archive && !Types::fileInfoChunkDataDictionaryFromCafChunkData(*archive).empty())
+    if (archive && !InfoTypes::fileInfoChunkDataDictionaryFromCafChunkData(*archive).empty())
         chunk_.chunkData().setChunkData(*archive, fourCC("caff"));
 }
 
@@ -56,8 +56,8 @@ bool FileInfoCafChunkWriter::writeChunk()
     Dictionary information;
     if (!archive || file_.information(information) != kStatusOK)
         return false;
-    const Dictionary info = Types::fileInfoChunkDataDictionaryFromCafChunkData(*archive);
-    return file_.setInformation(Types::cafFileInfoPropertyForMergingChunkDataDict(info, information)) == kStatusOK;
+    const Dictionary info = InfoTypes::fileInfoChunkDataDictionaryFromCafChunkData(*archive);
+    return file_.setInformation(InfoTypes::cafFileInfoPropertyForMergingChunkDataDict(info, information)) == kStatusOK;
 }
 
 bool FileInfoCafChunkRemover::removeChunk()
@@ -66,7 +66,7 @@ bool FileInfoCafChunkRemover::removeChunk()
     if (file_.information(information) != kStatusOK)
         return false;
     const std::size_t before = information.size();
-    for (const auto& [key, empty] : Types::cafFileInfoPropertyForMergingChunkDataDict({}, {}))
+    for (const auto& [key, empty] : InfoTypes::cafFileInfoPropertyForMergingChunkDataDict({}, {}))
         information.erase(key);
     return information.size() == before || file_.setInformation(information) == kStatusOK;
 }
@@ -75,14 +75,14 @@ void FileInfoAifChunkReader::readChunk()
 {
     Dictionary texts;
     for (const char* key : kKeys) {
-        const auto data = UserData::read(file_, Types::fileInfoTypeForKey(key), 0);
+        const auto data = UserData::read(file_, InfoTypes::fileInfoTypeForKey(key), 0);
         if (auto text = data ? textIn(key, *data) : std::nullopt)
-            texts[Types::fileInfoKeyForKey(key)] = std::move(*text);
+            texts[InfoTypes::fileInfoKeyForKey(key)] = std::move(*text);
     }
     if (texts.empty())
         return;
     if (auto* info = chunk_.chunkDataOfClass<VireoLoopFileInfoChunkData>()) // without the archive in between
-        return info->setDataDictionary(Types::fileInfoChunkDataDictionaryFromAifTexts(texts));
+        return info->setDataDictionary(InfoTypes::fileInfoChunkDataDictionaryFromAifTexts(texts));
     if (const auto archive = platform::archiveDictionary(texts))
         chunk_.chunkData().setChunkData(*archive, fourCC("AIFF"));
 }
@@ -93,8 +93,8 @@ bool FileInfoAifChunkWriter::writeChunk()
     if (!archive)
         return false;
     for (const char* key : kKeys) {
-        const auto part = Types::aifChunkDataPartFromAifChunkData(*archive, key);
-        if (part && !UserData::write(file_, Types::fileInfoTypeForKey(key), 0, *part))
+        const auto part = InfoTypes::aifChunkDataPartFromAifChunkData(*archive, key);
+        if (part && !UserData::write(file_, InfoTypes::fileInfoTypeForKey(key), 0, *part))
             return false;
     }
     return true;
@@ -104,6 +104,6 @@ bool FileInfoAifChunkRemover::removeChunk()
 {
     bool gone = true;
     for (const char* key : kKeys)
-        gone = UserData::removeAll(file_, Types::fileInfoTypeForKey(key)) && gone;
+        gone = UserData::removeAll(file_, InfoTypes::fileInfoTypeForKey(key)) && gone;
     return gone;
 }

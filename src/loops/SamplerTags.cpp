@@ -54,7 +54,7 @@ std::string inUTF8(std::string_view bytes, bool isAIFF)
     return platform::decodeFileText(bytes, isAIFF ? FallbackEncoding::macintosh : FallbackEncoding::latin1).utf8;
 }
 
-std::string_view trimmed(std::string_view text)
+std::string_view withoutBlanks(std::string_view text)
 {
     constexpr const char* kWhite = " \t\r\n\v\f";
     const std::size_t start = text.find_first_not_of(kWhite);
@@ -167,7 +167,7 @@ private:
                 if (const auto text = info->find(id))
                     addText(kInfoTexts, id, *text, InfoList::kForm, false);
             if (const auto text = info->find(fourCC("IBPM")))
-                addTempo(trimmed(*text));
+                addTempo(withoutBlanks(*text));
         } else if (auto names = AssociatedDataList::read(body, order_); names && !names_) {
             names_ = std::move(names);
         }
@@ -187,7 +187,7 @@ private:
         if (known == ids.end() || bytes.empty())
             return;
         const std::string decoded = inUTF8(bytes, isAIFF);
-        const std::string_view text = trimmed(decoded);
+        const std::string_view text = withoutBlanks(decoded);
         if (!text.empty() && std::ranges::find(tags_.texts, known->kind, &SamplerTags::Text::kind) == tags_.texts.end())
             tags_.texts.push_back({known->kind, std::string(text), source});
     }

@@ -16,12 +16,6 @@ using tagging::kCategoryTextSize;
 
 namespace {
 
-std::int64_t numberFor(const Dictionary& tags, const char* key)
-{
-    const auto* number = platform::find<std::int64_t>(tags, key);
-    return number != nullptr ? *number : 0;
-}
-
 std::string textFor(const Dictionary& tags, const char* key)
 {
     const auto* text = platform::find<std::string>(tags, key);
@@ -129,10 +123,13 @@ void readCategories(BytesView bytes, Dictionary& tags)
 
 BasicTaggingChunk basicTaggingOf(const Dictionary& tags)
 {
-    const auto number16 = [&](const char* key) { return static_cast<std::int16_t>(numberFor(tags, key)); };
+    const auto number16 = [&](const char* key) {
+        return static_cast<std::int16_t>(VireoLoopCombinedTagsChunkDataTypes::numberFor(tags, key));
+    };
     BasicTaggingChunk basic;
-    basic.beatCount = static_cast<std::int32_t>(
-        std::clamp<std::int64_t>(numberFor(tags, VireoLoopCombinedTagsChunkDataBeatCountKey), INT32_MIN, INT32_MAX));
+    basic.beatCount = static_cast<std::int32_t>(std::clamp<std::int64_t>(
+        VireoLoopCombinedTagsChunkDataTypes::numberFor(tags, VireoLoopCombinedTagsChunkDataBeatCountKey), INT32_MIN,
+        INT32_MAX));
     basic.midiRootNote = number16(VireoLoopCombinedTagsChunkDataMidiRootNoteKey);
     basic.keyType = number16(VireoLoopCombinedTagsChunkDataKeyType);
     basic.signatureTop = number16(VireoLoopCombinedTagsChunkDataSignatureTopKey);

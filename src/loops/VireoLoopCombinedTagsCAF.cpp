@@ -32,18 +32,14 @@ const std::string* firstOf(const SearchInfo& info, const char* key)
     return found == info.end() ? nullptr : &found->second.front();
 }
 
-std::int64_t numberFor(const Dictionary& tags, const char* key)
-{
-    const auto* number = platform::find<std::int64_t>(tags, key);
-    return number != nullptr ? *number : 0;
-}
-
 void addKey(const Dictionary& tags, tagging::StringPairs& strings)
 {
-    const std::string_view note = VireoLoopNoteName(numberFor(tags, VireoLoopCombinedTagsChunkDataMidiRootNoteKey));
+    const std::string_view note = VireoLoopNoteName(
+        VireoLoopCombinedTagsChunkDataTypes::numberFor(tags, VireoLoopCombinedTagsChunkDataMidiRootNoteKey));
     if (note.empty())
         return;
-    const std::int64_t type = numberFor(tags, VireoLoopCombinedTagsChunkDataKeyType);
+    const std::int64_t type =
+        VireoLoopCombinedTagsChunkDataTypes::numberFor(tags, VireoLoopCombinedTagsChunkDataKeyType);
     const std::string_view mode = VireoLoopModeName(type);
     strings["key signature"] = note;
     strings["key type"] = type == 0 || mode.empty() ? "any" : mode;
@@ -72,6 +68,12 @@ void addTexts(const Dictionary& tags, tagging::StringPairs& strings)
 }
 
 } // namespace
+
+std::int64_t VireoLoopCombinedTagsChunkDataTypes::numberFor(const Dictionary& tags, const char* key)
+{
+    const auto* number = platform::find<std::int64_t>(tags, key);
+    return number != nullptr ? *number : 0;
+}
 
 SearchInfo VireoLoopCombinedTagsChunkDataTypes::extractSearchInfoFromData(BytesView payload)
 {
@@ -134,12 +136,16 @@ std::optional<Bytes>
 VireoLoopCombinedTagsChunkDataTypes::cafChunkDataFromCombinedTagsChunkDataDictionary(const Dictionary& tags)
 {
     tagging::StringPairs strings;
-    const std::int64_t beatCount = numberFor(tags, VireoLoopCombinedTagsChunkDataBeatCountKey);
+    const std::int64_t beatCount =
+        VireoLoopCombinedTagsChunkDataTypes::numberFor(tags, VireoLoopCombinedTagsChunkDataBeatCountKey);
     if (beatCount > 0)
         strings["beat count"] = std::to_string(beatCount);
-    const std::int64_t top = numberFor(tags, VireoLoopCombinedTagsChunkDataSignatureTopKey);
-    const std::int64_t bottom = numberFor(tags, VireoLoopCombinedTagsChunkDataSignatureBottomKey);
-    if (numberFor(tags, VireoLoopCombinedTagsChunkDataFileTypeKey) == 1 && top >= 1 && bottom >= 1)
+    const std::int64_t top =
+        VireoLoopCombinedTagsChunkDataTypes::numberFor(tags, VireoLoopCombinedTagsChunkDataSignatureTopKey);
+    const std::int64_t bottom =
+        VireoLoopCombinedTagsChunkDataTypes::numberFor(tags, VireoLoopCombinedTagsChunkDataSignatureBottomKey);
+    if (VireoLoopCombinedTagsChunkDataTypes::numberFor(tags, VireoLoopCombinedTagsChunkDataFileTypeKey) == 1 &&
+        top >= 1 && bottom >= 1)
         strings["time signature"] = std::to_string(top) + "/" + std::to_string(bottom);
     addKey(tags, strings);
     addTexts(tags, strings);

@@ -35,6 +35,9 @@ inline constexpr const char* VireoLoopCombinedCategoryDataKey = "VireoLoopCombin
 /// Class operations only.
 class KT_EXPORT VireoLoopCombinedTagsChunkDataTypes {
 public:
+    /// The whole number under a key; 0 when there is none.
+    static std::int64_t numberFor(const platform::Dictionary& tags, const char* key);
+
     /// combinedTagsChunkDataDictionaryFromAifChunkData: — `archive` is the combined form; none for empty bytes.
     static std::optional<platform::Dictionary> combinedTagsChunkDataDictionaryFromAifChunkData(BytesView archive);
     /// What the former gives for the archive of these parts, of which either may be empty, without the archive.

@@ -1,23 +1,23 @@
 #include "loops/VireoLoopFileInfoChunkData.h"
 
-using Types = VireoLoopFileInfoChunkDataTypes;
+using InfoTypes = VireoLoopFileInfoChunkDataTypes;
 
 std::optional<Bytes> VireoLoopFileInfoChunkData::aifDataRepresentation() const
 {
-    return Types::aifChunkDataFromFileInfoChunkDataDictionary(_dataDictionary);
+    return InfoTypes::aifChunkDataFromFileInfoChunkDataDictionary(_dataDictionary);
 }
 
 std::optional<Bytes> VireoLoopFileInfoChunkData::cafDataRepresentation() const
 {
-    return Types::cafChunkDataFromFileInfoChunkDataDictionary(_dataDictionary);
+    return InfoTypes::cafChunkDataFromFileInfoChunkDataDictionary(_dataDictionary);
 }
 
 void VireoLoopFileInfoChunkData::readFromAIFData(BytesView data)
 {
-    _dataDictionary = Types::fileInfoChunkDataDictionaryFromAifChunkData(data);
+    _dataDictionary = InfoTypes::fileInfoChunkDataDictionaryFromAifChunkData(data);
 }
 
 void VireoLoopFileInfoChunkData::readFromCafData(BytesView data)
 {
-    _dataDictionary = Types::fileInfoChunkDataDictionaryFromCafChunkData(data);
+    _dataDictionary = InfoTypes::fileInfoChunkDataDictionaryFromCafChunkData(data);
 }

@@ -6,6 +6,7 @@
 #include "platform/core/Packed.h"
 #include "platform/core/Status.h"
 #include "support/FaultInjection.h"
+#include "support/References.h"
 #include "support/TemporaryFolder.h"
 
 #include <climits>
@@ -13,11 +14,6 @@
 #include <filesystem>
 
 namespace {
-
-CFileRef refOf(const std::string& path)
-{
-    return CFileRef(path.c_str(), false);
-}
 
 CChunkData chunkOf(FourCC id, std::string_view body)
 {
@@ -52,7 +48,7 @@ TEST(CAuFileIO, LibsndfileReadsWhatItWrote)
             SCOPED_TRACE(fourCCText(test.type) + std::to_string(test.bits) + " " + std::to_string(channels));
             std::filesystem::remove(path);
             CAuFileIO file;
-            ASSERT_EQ(file.CreateAndOpen(refOf(path), 0, channels, test.bits, 44100, test.type, nullptr), 0);
+            ASSERT_EQ(file.CreateAndOpen(::file(path), 0, channels, test.bits, 44100, test.type, nullptr), 0);
             EXPECT_EQ(file.DataFormat().formatFlags, test.flags);
             EXPECT_EQ(file.Swapped(), test.isSwapped);
             EXPECT_EQ(file.FileType(), test.type);
@@ -84,7 +80,7 @@ TEST(CAuFileIO, ReadsWhatLibsndfileWrote)
         writeSound(path, format, 2, frames);
         const Sound sound = readSound(path);
         CAuFileIO file;
-        ASSERT_EQ(file.Open(refOf(path), false), 0);
+        ASSERT_EQ(file.Open(::file(path), false), 0);
         EXPECT_EQ(file.NumFrames(), frames);
         EXPECT_EQ(file.NumChannels(), 2U);
         EXPECT_EQ(file.SampleRate(), 44100U);
@@ -107,7 +103,7 @@ TEST(CAuFileIO, ARangeThatCannotBeReadIsZero)
     const std::string path = folder / "audio";
     writeSound(path, SF_FORMAT_WAV | SF_FORMAT_PCM_16, 2, 40000);
     CAuFileIO file;
-    ASSERT_EQ(file.Open(refOf(path), false), 0);
+    ASSERT_EQ(file.Open(::file(path), false), 0);
     std::vector<float> samples(2 * 40000 + 1);
     const auto isZeroed = [&](long frames) {
         return std::all_of(samples.begin(), samples.begin() + 2 * frames, [](float sample) { return sample == 0; }) &&
@@ -144,7 +140,7 @@ TEST(CAuFileIO, OpensAndStaysOpen)
     const std::string path = folder / "audio";
     writeSound(path, SF_FORMAT_AIFF | SF_FORMAT_PCM_16, 1, 100);
     int status = 1;
-    CAuFileIO file(status, refOf(path), false);
+    CAuFileIO file(status, ::file(path), false);
     EXPECT_EQ(status, 0);
     EXPECT_EQ(file.OpenMode(), 1);
     {
@@ -163,13 +159,13 @@ TEST(CAuFileIO, OpensAndStaysOpen)
     EXPECT_EQ(file.BitDepth() + file.FileType() + static_cast<unsigned>(file.NumFrames()), 0U);
     EXPECT_EQ(file.Open(false), 0); // the reference stayed
 
-    EXPECT_EQ(file.Open(refOf(folder / "none"), true), kStatusFileNotFound);
+    EXPECT_EQ(file.Open(::file(folder / "none"), true), kStatusFileNotFound);
     EXPECT_EQ(file.OpenMode(), 3); // the one that was wanted
     EXPECT_EQ(file.BitDepth(), 0U);
     EXPECT_EQ(file.Open(CFileRef(), false), kStatusParameterError);
 
     platform::FileHandle handle;
-    ASSERT_TRUE(refOf(path).GetFSRef(&handle));
+    ASSERT_TRUE(::file(path).GetFSRef(&handle));
     EXPECT_EQ(file.Open(&handle, false), 0);
     EXPECT_EQ(file.NumFrames(), 100);
     EXPECT_EQ(file.Open(static_cast<const platform::FileHandle*>(nullptr), false), kStatusParameterError);
@@ -177,7 +173,7 @@ TEST(CAuFileIO, OpensAndStaysOpen)
     for (const int format :
          {SF_FORMAT_WAV | SF_FORMAT_IMA_ADPCM, SF_FORMAT_CAF | SF_FORMAT_ALAC_16, SF_FORMAT_AIFF | SF_FORMAT_ULAW}) {
         writeSound(path, format, 1, 100);
-        EXPECT_EQ(file.Open(refOf(path), true), -208);
+        EXPECT_EQ(file.Open(::file(path), true), -208);
         EXPECT_EQ(file.OpenMode(), -1);
         EXPECT_EQ(file.NumChannels() + file.FileType(), 0U);
     }
@@ -197,7 +193,7 @@ TEST(CAuFileIO, WritesOnlyWhereItMay)
     EXPECT_EQ(file.AddChunk(note, 0), -1);
     EXPECT_EQ(file.RemoveChunk(fourCC("note")), -1);
     EXPECT_EQ(file.FindChunk(fourCC("note"), note), -1);
-    ASSERT_EQ(file.Open(refOf(path), false), 0);
+    ASSERT_EQ(file.Open(::file(path), false), 0);
     EXPECT_EQ(file.WriteFloat(samples, 0, 8), -54);
     EXPECT_EQ(file.WriteFloat(nullptr, 0, 8), -54);
     EXPECT_EQ(file.AddChunk(note, 0), -1);
@@ -220,7 +216,7 @@ TEST(CAuFileIO, DataIsWrittenInTheFilesOrderAndLeftInIt)
     for (const auto type : {fourCC("WAVE"), fourCC("caff")}) {
         const std::string path = folder / fourCCText(type);
         CAuFileIO file;
-        ASSERT_EQ(file.CreateAndOpen(refOf(path).URL(), 0, 2, 16, 48000, type, nullptr), 0);
+        ASSERT_EQ(file.CreateAndOpen(::file(path).URL(), 0, 2, 16, 48000, type, nullptr), 0);
         std::int16_t data[4] = {0x0102, 0x0304, 0x0506, 0x0708};
         ASSERT_EQ(file.WriteData(data, 0, 2), 0);
         const auto order = type == fourCC("WAVE") ? std::endian::little : std::endian::big;
@@ -243,7 +239,7 @@ TEST(CAuFileIO, ChunksAreUserDataThatTheContainerClassFinds)
         writeSound(path, format, 1, 100);
         const Sound before = readSound(path);
         CAuFileIO file;
-        ASSERT_EQ(file.Open(refOf(path), true), 0);
+        ASSERT_EQ(file.Open(::file(path), true), 0);
         CChunkData chunk = chunkOf(fourCC("basc"), "old");
         EXPECT_FALSE(file.IsVireoLoop());
         EXPECT_EQ(file.AddChunk(chunk, 0), 1);
@@ -261,7 +257,7 @@ TEST(CAuFileIO, ChunksAreUserDataThatTheContainerClassFinds)
         EXPECT_EQ(found.id, fourCC("basc"));
         EXPECT_EQ(found.position, -1);
         EXPECT_EQ(found.next, -1);
-        CAudioFileIO other(refOf(path), 0);
+        CAudioFileIO other(::file(path), 0);
         EXPECT_EQ(other.FindChunk(fourCC("basc"), found), 1);
         EXPECT_EQ(textOf(found.bytes()), "replaced");
         EXPECT_EQ(readSound(path).samples, before.samples);
@@ -275,7 +271,7 @@ TEST(CAuFileIO, ChunksAreUserDataThatTheContainerClassFinds)
     // An item that is there but cannot be read.
     CChunkData chunk = chunkOf(fourCC("note"), std::string(100000, 'n'));
     CAuFileIO file;
-    ASSERT_EQ(file.Open(refOf(path), true), 0);
+    ASSERT_EQ(file.Open(::file(path), true), 0);
     ASSERT_EQ(file.AddChunk(chunk, 0), 1);
     std::uint32_t id = fourCC("note");
     ASSERT_EQ(file.FindChunk(static_cast<long>(id), chunk), 1);
@@ -292,9 +288,9 @@ TEST(CAuFileIO, AFileThatCannotBeCreatedChangesNothing)
     const std::string path = folder / "audio";
     writeSound(path, SF_FORMAT_WAV | SF_FORMAT_PCM_16, 1, 100);
     CAuFileIO file;
-    ASSERT_EQ(file.Open(refOf(path), false), 0);
+    ASSERT_EQ(file.Open(::file(path), false), 0);
     const auto create = [&](const std::string& name, int channels, int bits, long rate, FourCC type) {
-        return file.CreateAndOpen(refOf(folder / name), 0, channels, bits, rate, type, nullptr);
+        return file.CreateAndOpen(::file(folder / name), 0, channels, bits, rate, type, nullptr);
     };
     EXPECT_EQ(create("audio", 1, 16, 44100, fourCC("WAVE")), kStatusDuplicateName);
     EXPECT_EQ(create("new", 1, 32, 44100, fourCC("AIFF")), kStatusParameterError); // floats
@@ -318,7 +314,7 @@ TEST(CAuFileIO, ByteOrderTurnsLittleEndianOfWAVEElseBig)
         CAuFileIO file;
         if (container != 0) {
             writeSound(folder / "audio", container | SF_FORMAT_PCM_16, 1, 1);
-            ASSERT_EQ(file.Open(refOf(folder / "audio"), false), 0);
+            ASSERT_EQ(file.Open(::file(folder / "audio"), false), 0);
         }
         int number = 0x01020304;
         unsigned int natural = 0x01020304;

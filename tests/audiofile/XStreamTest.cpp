@@ -10,6 +10,7 @@
 #include "platform/core/Status.h"
 #include "support/FakeDecoder.h"
 #include "support/FaultInjection.h"
+#include "support/References.h"
 #include "support/TemporaryFolder.h"
 
 #include <cstring>
@@ -21,11 +22,6 @@ namespace {
 XStreamDescription floats(std::uint32_t channels)
 {
     return {44100, fourCC("lpcm"), 9, 4 * channels, 1, 4 * channels, channels, 32, 0};
-}
-
-CFileRef refOf(const std::string& path)
-{
-    return CFileRef(path.c_str(), false);
 }
 
 /// A stream that is closed at the end.
@@ -166,7 +162,7 @@ TEST(XStream, ArgumentsThatAreMissing)
         XStreamOpen(nullptr, 0, 0, 0, nullptr, nullptr, &other),
         XStreamOpen(path.c_str(), 0, 0, 0, nullptr, nullptr, nullptr),
         XStreamOpen("", 0, 0, 0, nullptr, nullptr, &other),
-        XStreamOpenWithFileRef(refOf(path), 0, 0, 0, nullptr, nullptr, nullptr),
+        XStreamOpenWithFileRef(file(path), 0, 0, 0, nullptr, nullptr, nullptr),
         XStreamOpenWithFileRef(CFileRef(), 0, 0, 0, nullptr, nullptr, &other),
         XStreamOpenWithFileRef(nullptr, 0, 0, 0, nullptr, nullptr, &other),
         XStreamCreateWithFileRef(parent, nullptr, 0, 0, fourCC("WAVE"), &client, 0, 0, &other),
@@ -207,10 +203,10 @@ TEST(XStream, OpensPathsOfAtMost1023Bytes)
     writeSound(longest, SF_FORMAT_WAV | SF_FORMAT_PCM_16, 1, 100);
     std::filesystem::copy_file(longest, longest + "f");
     XStreamRef stream = nullptr;
-    ASSERT_EQ(XStreamOpenWithFileRef(refOf(longest), 0xFFFFFF00, 0, 0, nullptr, nullptr, &stream), 0);
+    ASSERT_EQ(XStreamOpenWithFileRef(file(longest), 0xFFFFFF00, 0, 0, nullptr, nullptr, &stream), 0);
     EXPECT_EQ(XStreamClose(stream), 0);
     FaultInjector calls;
-    EXPECT_EQ(XStreamOpenWithFileRef(refOf(longest + "f"), 0, 0, 0, nullptr, nullptr, &stream), kStatusParameterError);
+    EXPECT_EQ(XStreamOpenWithFileRef(file(longest + "f"), 0, 0, 0, nullptr, nullptr, &stream), kStatusParameterError);
     EXPECT_EQ(stream, nullptr);
     EXPECT_EQ(calls.calls(Call::openFile) + calls.calls(Call::openFileWithoutLinks), 0);
 }
@@ -401,15 +397,15 @@ TEST(XStreamSaver, TheLatestOfEqualReferencesIsFound)
     FaultInjector calls;
     {
         ASSERT_EQ(XStreamOpen(path.c_str(), 0, 0, 0, nullptr, nullptr, &stream), 0);
-        const XStreamSaver first(stream, refOf(path));
-        auto second = std::make_unique<XStreamSaver>(nullptr, refOf(path));
-        const XStreamSaver third(nullptr, refOf(other));
+        const XStreamSaver first(stream, file(path));
+        auto second = std::make_unique<XStreamSaver>(nullptr, file(path));
+        const XStreamSaver third(nullptr, file(other));
         EXPECT_EQ(XStreamSaver::GetFirstXStreamObject(), &third);
-        EXPECT_EQ(XStreamSaver::FindXStreamObject(refOf(path)), second.get());
-        EXPECT_EQ(XStreamSaver::FindXStreamObject(refOf(folder / "none")), nullptr);
+        EXPECT_EQ(XStreamSaver::FindXStreamObject(file(path)), second.get());
+        EXPECT_EQ(XStreamSaver::FindXStreamObject(file(folder / "none")), nullptr);
         second.reset(); // from the middle
         EXPECT_EQ(third.GetNextXStreamObject(), &first);
-        EXPECT_EQ(XStreamSaver::FindXStreamObject(refOf(path)), &first);
+        EXPECT_EQ(XStreamSaver::FindXStreamObject(file(path)), &first);
         EXPECT_EQ(calls.calls(Call::close), 0);
     }
     EXPECT_EQ(calls.calls(Call::close), 1); // the stream's file

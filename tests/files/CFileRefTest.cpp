@@ -5,6 +5,7 @@
 #include "support/FaultInjection.h"
 #include "support/References.h"
 #include "support/TemporaryFolder.h"
+#include "support/URLs.h"
 
 #include <gtest/gtest.h>
 
@@ -15,11 +16,6 @@ namespace fs = std::filesystem;
 using platform::String;
 
 namespace {
-
-String text(const std::string& utf8)
-{
-    return String::fromUTF8(utf8);
-}
 
 /// The path with a slash at the end when the reference denotes a directory; empty when there is none.
 std::string shown(const CFileRef& ref)

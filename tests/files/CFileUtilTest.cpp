@@ -6,6 +6,7 @@
 #include "support/FaultInjection.h"
 #include "support/References.h"
 #include "support/TemporaryFolder.h"
+#include "support/URLs.h"
 
 #include <gtest/gtest.h>
 
@@ -14,15 +15,6 @@
 
 namespace fs = std::filesystem;
 using platform::String;
-
-namespace {
-
-String text(const std::string& utf8)
-{
-    return String::fromUTF8(utf8);
-}
-
-} // namespace
 
 TEST(CFileUtil, DeletesFilesAndLinksOnly)
 {

@@ -3,11 +3,11 @@
 
 #include "loops/VireoLoopChunksManager.h"
 #include "media/AudioContainers.h"
+#include "media/containers/ContainerHeaders.h"
 
 #include <map>
 #include <string>
 
-inline constexpr FourCC kAIFF = fourCC("AIFF");
 inline constexpr FourCC kCAF = fourCC("caff");
 
 inline VireoLoopChunksManager manage(const std::string& path, bool forWriting = true)

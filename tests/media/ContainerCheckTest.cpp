@@ -39,7 +39,7 @@ std::string frames32(std::uint32_t frames)
     return std::string(textOf(writer.view()));
 }
 
-struct Fault {
+struct ContainerFault {
     Bytes file;
     Kind kind;
     const char* chunk;
@@ -94,7 +94,7 @@ TEST(ContainerCheck, OneFaultIsOneFinding)
         file.erase(file.begin() + 71);
         return with(file, 4, frames32(static_cast<std::uint32_t>(file.size() - 8)));
     }();
-    const Fault faults[] = {
+    const ContainerFault faults[] = {
         {behind, Kind::chunkBehind, "note", 60, 60, 0},
         {[&] {
              Bytes file = wave;
@@ -139,7 +139,7 @@ TEST(ContainerCheck, OneFaultIsOneFinding)
         {with(wave, 0, "RF64"s), Kind::sizes64AreMissing, "RF64", 0, 0, 0},
         {with(long64, 76, frames32(14)), Kind::sizes64Differ, "data", 72, 14, 16},
     };
-    for (const Fault& fault : faults) {
+    for (const ContainerFault& fault : faults) {
         const std::vector<ContainerFinding> found = findingsOf(fault.file);
         SCOPED_TRACE(fault.chunk + std::to_string(static_cast<int>(fault.kind)));
         ASSERT_FALSE(found.empty());

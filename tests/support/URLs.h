@@ -5,6 +5,11 @@
 
 #include <string>
 
+inline platform::String text(const std::string& utf8)
+{
+    return platform::String::fromUTF8(utf8);
+}
+
 inline platform::URLRef urlOf(const std::string& path, bool isDirectory = false)
 {
     return platform::URL::createWithFileSystemPath(platform::String::fromUTF8(path), platform::PathStyle::posix,

@@ -271,6 +271,6 @@ void declareAdm(CommandLine& commandLine)
     verb.addFlag("--check", arguments.isCheck, "Print only what is wrong: FILE:LINE:COLUMN: NAME: REASON");
 }
 
-const VerbRegistration registration{60, "adm", declareAdm};
+const VerbRegistration admRegistration{60, "adm", declareAdm};
 
 } // namespace

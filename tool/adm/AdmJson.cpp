@@ -12,12 +12,6 @@ std::optional<std::int64_t> knownTime(std::int64_t microseconds)
     return microseconds == kADMInvalidTime ? std::nullopt : std::optional(microseconds);
 }
 
-template <class Number>
-std::optional<Number> positive(Number number)
-{
-    return number > 0 ? std::optional(number) : std::nullopt;
-}
-
 void writeLabels(JsonWriter& json, std::string_view key, const ADMLabels& labels)
 {
     json.key(key);

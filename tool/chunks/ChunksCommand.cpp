@@ -182,6 +182,6 @@ void declareChunks(CommandLine& commandLine)
     declareChunkEdits(commandLine, verb);
 }
 
-const VerbRegistration registration{20, "chunks", declareChunks};
+const VerbRegistration chunksRegistration{20, "chunks", declareChunks};
 
 } // namespace

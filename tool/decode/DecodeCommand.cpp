@@ -140,6 +140,6 @@ void declareDecode(CommandLine& commandLine)
     verb.addFlag("--force", arguments.options.force, "Replace files that exist");
 }
 
-const VerbRegistration registration{90, "decode", declareDecode};
+const VerbRegistration decodeRegistration{90, "decode", declareDecode};
 
 } // namespace

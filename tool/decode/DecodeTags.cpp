@@ -37,7 +37,7 @@ bool isOfTheSound(platform::ContainerKind container, FourCC id)
            std::ranges::find(kOfNoUse, id) != std::end(kOfNoUse);
 }
 
-std::string nameOf(FourCC id)
+std::string chunkName(FourCC id)
 {
     const std::string text = fourCCText(id);
     return text.substr(0, text.find_last_not_of(' ') + 1);
@@ -83,9 +83,9 @@ std::vector<std::string> otherChunks(const std::string& path, bool holdsTags)
     const auto visit = [&](const ChunkEntry& chunk) {
         const bool isTold = isOfTheSound(extent.kind, chunk.id) ||
                             (holdsTags && std::ranges::find(kOfTags, chunk.id) != std::end(kOfTags)) ||
-                            std::ranges::find(others, nameOf(chunk.id)) != others.end();
+                            std::ranges::find(others, chunkName(chunk.id)) != others.end();
         if (!isTold)
-            others.push_back(nameOf(chunk.id));
+            others.push_back(chunkName(chunk.id));
         return others.size() < 1000;
     };
     file.ForEachChunk(visit, &extent);
@@ -149,7 +149,7 @@ DecodeTags::DecodeTags(const std::string& path)
 void DecodeTags::forget(std::span<const FourCC> ids)
 {
     for (const FourCC id : ids) {
-        std::erase(others_, nameOf(id));
+        std::erase(others_, chunkName(id));
         if (id == fourCC("info"))
             std::erase(others_, "the rest of info");
     }

@@ -68,12 +68,6 @@ std::string typeByNameText(const FileFacts& facts)
     return facts.typeByName != 0 ? fourCCText(facts.typeByName) : "";
 }
 
-template <class Number>
-std::optional<Number> positive(Number number)
-{
-    return number > 0 ? std::optional(number) : std::nullopt;
-}
-
 /// What is asked for beside the description itself.
 struct InfoOptions {
     bool isLong = false, isCheck = false, wantsMD5 = false, wantsSHA256 = false;
@@ -323,6 +317,6 @@ void declareInfo(CommandLine& commandLine)
         .excludes(sha256);
 }
 
-const VerbRegistration registration{10, "info", declareInfo};
+const VerbRegistration infoRegistration{10, "info", declareInfo};
 
 } // namespace

@@ -214,6 +214,6 @@ void declareLock(CommandLine& commandLine)
         "when it cannot be run; 1 when the lock was not had, and 2 for a mistake on the command line.");
 }
 
-const VerbRegistration registration{70, "lock", declareLock};
+const VerbRegistration lockRegistration{70, "lock", declareLock};
 
 } // namespace

@@ -129,6 +129,6 @@ void declareLocks(CommandLine& commandLine)
     CommandLine::addFiles(verb, files).describe("The files; else all");
 }
 
-const VerbRegistration registration{80, "locks", declareLocks};
+const VerbRegistration locksRegistration{80, "locks", declareLocks};
 
 } // namespace

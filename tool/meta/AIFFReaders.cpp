@@ -92,7 +92,7 @@ bool readApplication(const MetaChunk& chunk, const MetaSource&, MetaFields& fiel
     return true;
 }
 
-constexpr MetaReader kReaders[] = {
+constexpr MetaReader kAIFFReaders[] = {
     {fourCC("NAME"), "NAME", readText},
     {fourCC("AUTH"), "AUTH", readText},
     {fourCC("(c) "), "(c)", readText},
@@ -112,5 +112,5 @@ constexpr MetaReader kReaders[] = {
 
 std::span<const MetaReader> aiffReaders()
 {
-    return kReaders;
+    return kAIFFReaders;
 }

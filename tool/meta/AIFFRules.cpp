@@ -14,7 +14,6 @@ namespace {
 
 constexpr FourCC kAnnotation = fourCC("ANNO"), kComments = fourCC("COMT"), kMarkers = fourCC("MARK"),
                  kInstrument = fourCC("INST");
-constexpr double kNoLimit = 1e9;
 constexpr std::int16_t kMostId = std::numeric_limits<std::int16_t>::max();
 
 Bytes asBytes(const std::string& text)
@@ -230,11 +229,11 @@ void removeMarkers(MetaEdit& edit, const MetaStep&)
 
 using K = MetaKind;
 
-constexpr MetaRule kRules[] = {
-    {"NAME", K::text, {0, kNoLimit}, setText<fourCC("NAME")>},
-    {"AUTH", K::text, {0, kNoLimit}, setText<fourCC("AUTH")>},
-    {"(c)", K::text, {0, kNoLimit}, setText<fourCC("(c) ")>},
-    {"ANNO", K::text, {0, kNoLimit}, setText<kAnnotation>},
+constexpr MetaRule kAIFFRules[] = {
+    {"NAME", K::text, kAnyLength, setText<fourCC("NAME")>},
+    {"AUTH", K::text, kAnyLength, setText<fourCC("AUTH")>},
+    {"(c)", K::text, kAnyLength, setText<fourCC("(c) ")>},
+    {"ANNO", K::text, kAnyLength, setText<kAnnotation>},
 
     {"comt[N].text", K::text, {0, 65535}, setCommentText},
     {"comt[N].timeStamp", K::moment, {}, setCommentTime},
@@ -253,5 +252,5 @@ constexpr MetaRule kRules[] = {
 
 std::span<const MetaRule> aiffRules()
 {
-    return kRules;
+    return kAIFFRules;
 }

@@ -12,7 +12,6 @@
 namespace {
 
 constexpr FourCC kBext = fourCC("bext");
-constexpr double kNoLimit = 1e9;
 
 /// A file that has no such chunk yet gets one of version 1.
 template <class Change>
@@ -165,7 +164,7 @@ void setHistoryLine(MetaEdit& edit, const MetaStep& step)
 
 using K = MetaKind;
 
-constexpr MetaRule kRules[] = {
+constexpr MetaRule kBextRules[] = {
     {"bext.description", K::ascii, {0, 256}, setBext<&BroadcastExtension::description>},
     {"bext.originator", K::line, {0, 32}, setBext<&BroadcastExtension::originator>},
     {"bext.originatorReference", K::line, {0, 32}, setBext<&BroadcastExtension::originatorReference>},
@@ -179,8 +178,8 @@ constexpr MetaRule kRules[] = {
     {"bext.maxTruePeakLevel", K::decimal, {-99.99, 99.99}, setLoudness<2>},
     {"bext.maxMomentaryLoudness", K::decimal, {-99.99, 99.99}, setLoudness<3>},
     {"bext.maxShortTermLoudness", K::decimal, {-99.99, 99.99}, setLoudness<4>},
-    {"bext.codingHistory", K::ascii, {0, kNoLimit}, setHistory},
-    {"bext.codingHistory[N]", K::line, {0, kNoLimit}, setHistoryLine},
+    {"bext.codingHistory", K::ascii, kAnyLength, setHistory},
+    {"bext.codingHistory[N]", K::line, kAnyLength, setHistoryLine},
     {"bext", K::none, {}, removeChunk<kBext>},
 };
 
@@ -188,5 +187,5 @@ constexpr MetaRule kRules[] = {
 
 std::span<const MetaRule> bextRules()
 {
-    return kRules;
+    return kBextRules;
 }

@@ -63,7 +63,7 @@ void addMarkers(const std::string& name, const std::vector<CAFMarker>& markers, 
     }
 }
 
-bool readMarkers(const MetaChunk& chunk, const MetaSource& source, MetaFields& fields)
+bool readCAFMarkers(const MetaChunk& chunk, const MetaSource& source, MetaFields& fields)
 {
     const auto list = CAFMarkerList::read(chunk.body);
     if (!list)
@@ -100,7 +100,7 @@ bool readRegions(const MetaChunk& chunk, const MetaSource& source, MetaFields& f
     return true;
 }
 
-bool readInstrument(const MetaChunk& chunk, const MetaSource& source, MetaFields& fields)
+bool readCAFInstrument(const MetaChunk& chunk, const MetaSource& source, MetaFields& fields)
 {
     const auto instrument = CAFInstrumentChunk::read(chunk.body);
     if (!instrument)
@@ -183,12 +183,12 @@ bool readOwn(const MetaChunk& chunk, const MetaSource&, MetaFields& fields)
     return true;
 }
 
-constexpr MetaReader kReaders[] = {
+constexpr MetaReader kCAFReaders[] = {
     {fourCC("info"), "info", readTexts},
     {fourCC("strg"), "strg", readStrings},
-    {fourCC("mark"), "mark", readMarkers, fourCC("strg")},
+    {fourCC("mark"), "mark", readCAFMarkers, fourCC("strg")},
     {fourCC("regn"), "regn", readRegions, fourCC("strg")},
-    {fourCC("inst"), "inst", readInstrument, fourCC("strg")},
+    {fourCC("inst"), "inst", readCAFInstrument, fourCC("strg")},
     {fourCC("chan"), "chan", readChannels},
     {fourCC("midi"), "midi", readPreview},
     {fourCC("umid"), "umid", readUMID},
@@ -202,5 +202,5 @@ constexpr MetaReader kReaders[] = {
 
 std::span<const MetaReader> cafReaders()
 {
-    return kReaders;
+    return kCAFReaders;
 }

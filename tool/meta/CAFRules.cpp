@@ -14,8 +14,7 @@
 
 namespace {
 
-constexpr FourCC kInfo = fourCC("info"), kStrings = fourCC("strg"), kMarkers = fourCC("mark");
-constexpr double kMost32 = 4294967295.0, kNoLimit = 1e9;
+constexpr FourCC kInfo = fourCC("info"), kStrings = fourCC("strg"), kCAFMarkers = fourCC("mark");
 
 // "info":
 
@@ -40,7 +39,7 @@ constexpr std::array<std::string_view, 19> kKeys{"tempo",
                                                  "nominal bit rate",
                                                  "channel layout"};
 
-void setInfo(MetaEdit& edit, const MetaStep& step)
+void setCAFInfo(MetaEdit& edit, const MetaStep& step)
 {
     const std::string& key = step.name.rest;
     MetaChunk* const chunk = edit.find(kInfo);
@@ -78,7 +77,7 @@ std::uint32_t freeTextId(MetaEdit& edit, const CAFStringTable& table)
     for (const CAFStringEntry& entry : table.entries)
         most = std::max<std::uint32_t>(most, entry.id);
     // Markers and regions may have ids without a text.
-    if (const MetaChunk* const chunk = edit.find(kMarkers))
+    if (const MetaChunk* const chunk = edit.find(kCAFMarkers))
         if (const auto list = CAFMarkerList::read(chunk->body))
             for (const CAFMarker& marker : list->markers)
                 most = std::max<std::uint32_t>(most, marker.id);
@@ -136,15 +135,15 @@ void setString(MetaEdit& edit, const MetaStep& step)
     putChunk(edit, kStrings, table);
 }
 
-CAFMarkerList markersOf(MetaEdit& edit)
+CAFMarkerList cafMarkersOf(MetaEdit& edit)
 {
-    return valueOf<CAFMarkerList>(edit, kMarkers);
+    return valueOf<CAFMarkerList>(edit, kCAFMarkers);
 }
 
 template <class Change>
-void changeMarker(MetaEdit& edit, const MetaStep& step, Change change)
+void changeCAFMarker(MetaEdit& edit, const MetaStep& step, Change change)
 {
-    CAFMarkerList list = markersOf(edit);
+    CAFMarkerList list = cafMarkersOf(edit);
     const auto index = edit.itemOf(step, 0, list.markers.size());
     if (!index)
         return;
@@ -152,20 +151,20 @@ void changeMarker(MetaEdit& edit, const MetaStep& step, Change change)
         if (!edit.names(step.name.upTo(0) + ".position"))
             MetaEdit::refuse(step, "a new marker needs its position");
         if (list.missingMarkers != 0)
-            MetaEdit::refuseDamaged(kMarkers);
+            MetaEdit::refuseDamaged(kCAFMarkers);
         CAFMarker& marker = list.markers.emplace_back();
         CAFTimecode& none = marker.timecode;
         none.hours = none.minutes = none.seconds = none.frames = std::int8_t{-1};
         none.subFrameSampleOffset = 0xFFFFFFFF;
     }
     change(list, list.markers[*index]);
-    putChunk(edit, kMarkers, list);
+    putChunk(edit, kCAFMarkers, list);
 }
 
-void setPosition(MetaEdit& edit, const MetaStep& step)
+void setCAFPosition(MetaEdit& edit, const MetaStep& step)
 {
     constexpr std::uint64_t most = std::uint64_t{1} << 53; // of whole numbers in a double
-    changeMarker(edit, step, [&](CAFMarkerList&, CAFMarker& marker) {
+    changeCAFMarker(edit, step, [&](CAFMarkerList&, CAFMarker& marker) {
         const std::uint64_t frames = edit.framesOf(step, most);
         if (edit.file().frames >= 0 && frames > static_cast<std::uint64_t>(edit.file().frames) && !edit.isLenient())
             MetaEdit::refuse(step, fmt::format("frame {}, but the sound ends at frame {}; --lenient writes it", frames,
@@ -177,15 +176,15 @@ void setPosition(MetaEdit& edit, const MetaStep& step)
 template <auto member>
 void setNumber(MetaEdit& edit, const MetaStep& step)
 {
-    changeMarker(edit, step, [&](CAFMarkerList&, CAFMarker& marker) {
+    changeCAFMarker(edit, step, [&](CAFMarkerList&, CAFMarker& marker) {
         marker.*member = static_cast<std::uint32_t>(step.number());
     });
 }
 
 /// A text of its own: one that others have too stays theirs.
-void setMarkerName(MetaEdit& edit, const MetaStep& step)
+void setCAFMarkerName(MetaEdit& edit, const MetaStep& step)
 {
-    changeMarker(edit, step, [&](CAFMarkerList& list, CAFMarker& marker) {
+    changeCAFMarker(edit, step, [&](CAFMarkerList& list, CAFMarker& marker) {
         CAFStringTable table = stringsOf(edit);
         const std::uint32_t before = marker.id;
         auto entry = std::ranges::find_if(table.entries, [&](const CAFStringEntry& each) { return each.id == before; });
@@ -206,42 +205,42 @@ void setMarkerName(MetaEdit& edit, const MetaStep& step)
     });
 }
 
-void removeMarker(MetaEdit& edit, const MetaStep& step)
+void removeCAFMarker(MetaEdit& edit, const MetaStep& step)
 {
-    CAFMarkerList list = markersOf(edit);
+    CAFMarkerList list = cafMarkersOf(edit);
     const auto index = edit.itemOf(step, 0, list.markers.size());
     if (!index)
         return;
     if (list.missingMarkers != 0)
-        MetaEdit::refuseDamaged(kMarkers);
+        MetaEdit::refuseDamaged(kCAFMarkers);
     list.markers.erase(list.markers.begin() + static_cast<std::ptrdiff_t>(*index));
     edit.itemRemoved(step, 0);
     if (list.markers.empty() && list.behind.empty())
-        edit.remove(*edit.find(kMarkers));
+        edit.remove(*edit.find(kCAFMarkers));
     else
-        putChunk(edit, kMarkers, list);
+        putChunk(edit, kCAFMarkers, list);
 }
 
 using K = MetaKind;
 
-constexpr MetaRule kRules[] = {
+constexpr MetaRule kCAFRules[] = {
     {"info", K::none, {}, removeChunk<kInfo>},
-    {"info.*", K::text, {0, kNoLimit}, setInfo},
+    {"info.*", K::text, kAnyLength, setCAFInfo},
 
-    {"strg[N].text", K::text, {0, kNoLimit}, setString},
+    {"strg[N].text", K::text, kAnyLength, setString},
 
-    {"mark[N].position", K::time, {}, setPosition, true},
-    {"mark[N].name", K::text, {0, kNoLimit}, setMarkerName},
+    {"mark[N].position", K::time, {}, setCAFPosition, true},
+    {"mark[N].name", K::text, kAnyLength, setCAFMarkerName},
     {"mark[N].type", K::id, {}, setNumber<&CAFMarker::type>},
-    {"mark[N].id", K::integer, {0, kMost32}, setNumber<&CAFMarker::id>},
-    {"mark[N].channel", K::integer, {0, kMost32}, setNumber<&CAFMarker::channel>},
-    {"mark[N]", K::none, {}, removeMarker},
-    {"mark", K::none, {}, removeChunk<kMarkers>},
+    {"mark[N].id", K::integer, kUnsigned32, setNumber<&CAFMarker::id>},
+    {"mark[N].channel", K::integer, kUnsigned32, setNumber<&CAFMarker::channel>},
+    {"mark[N]", K::none, {}, removeCAFMarker},
+    {"mark", K::none, {}, removeChunk<kCAFMarkers>},
 };
 
 } // namespace
 
 std::span<const MetaRule> cafRules()
 {
-    return kRules;
+    return kCAFRules;
 }

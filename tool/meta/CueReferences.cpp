@@ -13,7 +13,7 @@
 
 namespace {
 
-constexpr FourCC kCue = fourCC("cue "), kPlaylist = fourCC("plst"), kSampler = fourCC("smpl");
+constexpr FourCC kCuePoints = fourCC("cue "), kPlaylist = fourCC("plst"), kSampler = fourCC("smpl");
 
 /// Changes each list "adtl"; one without items goes.
 template <class Change>
@@ -60,7 +60,7 @@ std::uint32_t freeCueId(MetaEdit& edit, std::uint32_t least)
         for (const auto& record : records)
             used.insert(record.*id);
     };
-    changeChunks<CueList>(edit, kCue, [&](const CueList& list) { use(list.points, &CuePoint::id); });
+    changeChunks<CueList>(edit, kCuePoints, [&](const CueList& list) { use(list.points, &CuePoint::id); });
     changeChunks<PlaylistChunk>(edit, kPlaylist,
                                 [&](const PlaylistChunk& list) { use(list.segments, &PlaylistSegment::cueId); });
     changeChunks<SamplerChunk>(edit, kSampler,

@@ -14,7 +14,6 @@ namespace {
 
 constexpr FourCC kCue = fourCC("cue ");
 constexpr FourCC kLabel = fourCC("labl"), kNote = fourCC("note"), kRange = fourCC("ltxt");
-constexpr double kMost16 = 65535, kMost32 = 4294967295.0, kNoLimit = 1e9;
 
 CueList cuesOf(MetaEdit& edit)
 {
@@ -224,21 +223,21 @@ void removeCues(MetaEdit& edit, const MetaStep&)
 
 using K = MetaKind;
 
-constexpr MetaRule kRules[] = {
+constexpr MetaRule kCueRules[] = {
     {"cue[N].position", K::time, {}, setPoint<&CuePoint::sampleOffset>, true},
-    {"cue[N].id", K::integer, {0, kMost32}, setPointId, true},
+    {"cue[N].id", K::integer, kUnsigned32, setPointId, true},
     {"cue[N].playlistPosition", K::time, {}, setPoint<&CuePoint::position>},
-    {"cue[N].chunkStart", K::integer, {0, kMost32}, setPoint<&CuePoint::chunkStart>},
-    {"cue[N].blockStart", K::integer, {0, kMost32}, setPoint<&CuePoint::blockStart>},
-    {"cue[N].label", K::text, {0, kNoLimit}, setCueText<kLabel>},
-    {"cue[N].note", K::text, {0, kNoLimit}, setCueText<kNote>},
+    {"cue[N].chunkStart", K::integer, kUnsigned32, setPoint<&CuePoint::chunkStart>},
+    {"cue[N].blockStart", K::integer, kUnsigned32, setPoint<&CuePoint::blockStart>},
+    {"cue[N].label", K::text, kAnyLength, setCueText<kLabel>},
+    {"cue[N].note", K::text, kAnyLength, setCueText<kNote>},
     {"cue[N].length", K::time, {}, setLength},
     {"cue[N].purpose", K::id, {}, setRange<&CueRange::purpose>},
-    {"cue[N].text", K::text, {0, kNoLimit}, setRange<&CueRange::text>},
-    {"cue[N].country", K::integer, {0, kMost16}, setRange<&CueRange::country>},
-    {"cue[N].language", K::integer, {0, kMost16}, setRange<&CueRange::language>},
-    {"cue[N].dialect", K::integer, {0, kMost16}, setRange<&CueRange::dialect>},
-    {"cue[N].codePage", K::integer, {0, kMost16}, setRange<&CueRange::codePage>},
+    {"cue[N].text", K::text, kAnyLength, setRange<&CueRange::text>},
+    {"cue[N].country", K::integer, kUnsigned16, setRange<&CueRange::country>},
+    {"cue[N].language", K::integer, kUnsigned16, setRange<&CueRange::language>},
+    {"cue[N].dialect", K::integer, kUnsigned16, setRange<&CueRange::dialect>},
+    {"cue[N].codePage", K::integer, kUnsigned16, setRange<&CueRange::codePage>},
     {"cue[N]", K::none, {}, removePoint},
     {"cue", K::none, {}, removeCues},
 };
@@ -247,5 +246,5 @@ constexpr MetaRule kRules[] = {
 
 std::span<const MetaRule> cueRules()
 {
-    return kRules;
+    return kCueRules;
 }

@@ -10,8 +10,6 @@
 
 namespace {
 
-constexpr double kNoLimit = 1e9;
-
 /// Ids that are in no list of them are taken where they stand already, so that none comes of a slip.
 void requireKnown(const MetaEdit& edit, const MetaStep& step, const std::string& id, bool stands)
 {
@@ -67,14 +65,14 @@ void setInfo(MetaEdit& edit, const MetaStep& step)
     putList(edit, chunk, list);
 }
 
-constexpr MetaRule kRules[] = {
+constexpr MetaRule kInfoRules[] = {
     {"info", MetaKind::none, {}, removeChunk<kListId, InfoList::kForm>},
-    {"info.*", MetaKind::text, {0, kNoLimit}, setInfo},
+    {"info.*", MetaKind::text, kAnyLength, setInfo},
 };
 
 } // namespace
 
 std::span<const MetaRule> infoRules()
 {
-    return kRules;
+    return kInfoRules;
 }

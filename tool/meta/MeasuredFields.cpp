@@ -25,11 +25,11 @@ struct LoudnessField {
     double shortest; // seconds of sound that it takes
     const char* unit;
 };
-constexpr std::array kLoudness{LoudnessField{"bext.loudnessValue", &Loudness::integrated, 0.4, "LUFS"},
-                               LoudnessField{"bext.loudnessRange", &Loudness::range, 3, "LU"},
-                               LoudnessField{"bext.maxTruePeakLevel", &Loudness::maxTruePeak, 0, "dBTP"},
-                               LoudnessField{"bext.maxMomentaryLoudness", &Loudness::maxMomentary, 0.4, "LUFS"},
-                               LoudnessField{"bext.maxShortTermLoudness", &Loudness::maxShortTerm, 3, "LUFS"}};
+constexpr std::array kLoudnessFields{LoudnessField{"bext.loudnessValue", &Loudness::integrated, 0.4, "LUFS"},
+                                     LoudnessField{"bext.loudnessRange", &Loudness::range, 3, "LU"},
+                                     LoudnessField{"bext.maxTruePeakLevel", &Loudness::maxTruePeak, 0, "dBTP"},
+                                     LoudnessField{"bext.maxMomentaryLoudness", &Loudness::maxMomentary, 0.4, "LUFS"},
+                                     LoudnessField{"bext.maxShortTermLoudness", &Loudness::maxShortTerm, 3, "LUFS"}};
 constexpr double kMostStored = 99.99; // of either sign
 
 /// Of a file that was cut the rest may still be had.
@@ -79,7 +79,7 @@ void addLoudness(const std::string& path, bool quiet, std::vector<MetaStep>& ste
     SoundReader sound(path);
     const Loudness loudness = measure(sound, path, quiet);
     const double seconds = static_cast<double>(sound.info().frames) / sampleRateOf(sound.info());
-    for (const LoudnessField& field : kLoudness) {
+    for (const LoudnessField& field : kLoudnessFields) {
         const std::optional<double>& value = loudness.*field.value;
         const bool isStored = value && std::abs(*value) <= kMostStored;
         if (!isStored)
@@ -118,7 +118,7 @@ void requireNotTyped(const MeasuredFields& wanted, const std::vector<MetaStep>& 
         if (step.name.parts.front().number() != 0U)
             continue; // of a second "bext"
         const std::string name = step.name.pattern(false);
-        if (wanted.loudness && std::ranges::find(kLoudness, name, &LoudnessField::name) != kLoudness.end())
+        if (wanted.loudness && std::ranges::find(kLoudnessFields, name, &LoudnessField::name) != kLoudnessFields.end())
             throw UsageError(name + " is what --loudness measures");
         if (wanted.md5 && name == "md5")
             throw UsageError("md5 is what --md5 reckons");

@@ -110,6 +110,6 @@ void declareMeta(CommandLine& commandLine)
     declareMetaImport(commandLine, verb);
 }
 
-const VerbRegistration registration{35, "meta", declareMeta};
+const VerbRegistration metaRegistration{35, "meta", declareMeta};
 
 } // namespace

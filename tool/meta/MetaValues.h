@@ -45,6 +45,7 @@ enum class MetaKind {
 struct MetaRange {
     double least = 0, most = 0;
 };
+inline constexpr MetaRange kAnyLength{0, 1e9}, kUnsigned16{0, 65535}, kUnsigned32{0, 4294967295.0};
 
 /// Numbers stand for ids, types, offsets and moments, as chunks have them; nothing for a removal.
 using MetaValue = std::variant<std::monostate, std::string, std::int64_t, double, MetaTime, Bytes>;

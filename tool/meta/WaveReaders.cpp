@@ -307,7 +307,7 @@ bool readDigest(const MetaChunk& chunk, const MetaSource&, MetaFields& fields)
     return true;
 }
 
-constexpr MetaReader kReaders[] = {
+constexpr MetaReader kWaveReaders[] = {
     {fourCC("bext"), "bext", readBroadcast},
     {fourCC("iXML"), "ixml", readIXML},
     {fourCC("LIST"), "LIST", readList, fourCC("cue ")},
@@ -335,5 +335,5 @@ constexpr MetaReader kReaders[] = {
 
 std::span<const MetaReader> waveReaders()
 {
-    return kReaders;
+    return kWaveReaders;
 }

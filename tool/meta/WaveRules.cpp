@@ -14,8 +14,6 @@
 
 namespace {
 
-constexpr double kMost16 = 65535, kMost32 = 4294967295.0, kNoLimit = 1e9;
-
 // What a file gets that has no such chunk yet.
 
 CartChunk freshOf(const MetaEdit&, const CartChunk*)
@@ -181,7 +179,7 @@ void setDigest(MetaEdit& edit, const MetaStep& step)
 
 using K = MetaKind;
 
-constexpr MetaRule kRules[] = {
+constexpr MetaRule kWaveRules[] = {
     {"cart.version", K::line, {0, 4}, setCart<&CartChunk::version>},
     {"cart.title", K::line, {0, 64}, setCart<&CartChunk::title>},
     {"cart.artist", K::line, {0, 64}, setCart<&CartChunk::artist>},
@@ -202,30 +200,30 @@ constexpr MetaRule kRules[] = {
     {"cart.timer[N].position", K::time, {}, setTimer<false>},
     {"cart.timer[N]", K::none, {}, removeTimer},
     {"cart.url", K::line, {0, 1024}, setCart<&CartChunk::url>},
-    {"cart.tagText", K::ascii, {0, kNoLimit}, setTagText},
+    {"cart.tagText", K::ascii, kAnyLength, setTagText},
     {"cart", K::none, {}, removeChunk<fourCC("cart")>},
 
-    {"acid.flags", K::integer, {0, kMost32}, setAcid<&AcidChunk::flags>},
+    {"acid.flags", K::integer, kUnsigned32, setAcid<&AcidChunk::flags>},
     {"acid.rootNote", K::integer, {0, 127}, setAcidRoot},
-    {"acid.beats", K::integer, {0, kMost32}, setAcid<&AcidChunk::beats>},
-    {"acid.meterNumerator", K::integer, {0, kMost16}, setAcid<&AcidChunk::meterNumerator>},
-    {"acid.meterDenominator", K::integer, {0, kMost16}, setAcid<&AcidChunk::meterDenominator>},
+    {"acid.beats", K::integer, kUnsigned32, setAcid<&AcidChunk::beats>},
+    {"acid.meterNumerator", K::integer, kUnsigned16, setAcid<&AcidChunk::meterNumerator>},
+    {"acid.meterDenominator", K::integer, kUnsigned16, setAcid<&AcidChunk::meterDenominator>},
     {"acid.tempo", K::decimal, {0, 10000}, setAcid<&AcidChunk::tempo>},
     {"acid", K::none, {}, removeChunk<fourCC("acid")>},
 
-    {"smpl.manufacturer", K::integer, {0, kMost32}, setSampler<&SamplerChunk::manufacturer>},
-    {"smpl.product", K::integer, {0, kMost32}, setSampler<&SamplerChunk::product>},
-    {"smpl.samplePeriod", K::integer, {0, kMost32}, setSampler<&SamplerChunk::samplePeriod>},
+    {"smpl.manufacturer", K::integer, kUnsigned32, setSampler<&SamplerChunk::manufacturer>},
+    {"smpl.product", K::integer, kUnsigned32, setSampler<&SamplerChunk::product>},
+    {"smpl.samplePeriod", K::integer, kUnsigned32, setSampler<&SamplerChunk::samplePeriod>},
     {"smpl.midiUnityNote", K::integer, {0, 127}, setSampler<&SamplerChunk::midiUnityNote>},
-    {"smpl.midiPitchFraction", K::integer, {0, kMost32}, setSampler<&SamplerChunk::midiPitchFraction>},
-    {"smpl.smpteFormat", K::integer, {0, kMost32}, setSMPTEFormat},
+    {"smpl.midiPitchFraction", K::integer, kUnsigned32, setSampler<&SamplerChunk::midiPitchFraction>},
+    {"smpl.smpteFormat", K::integer, kUnsigned32, setSMPTEFormat},
     {"smpl.smpteOffset", K::smpteOffset, {}, setSampler<&SamplerChunk::smpteOffset>},
-    {"smpl.loop[N].cueId", K::integer, {0, kMost32}, setLoop<&SamplerLoop::cueId>},
+    {"smpl.loop[N].cueId", K::integer, kUnsigned32, setLoop<&SamplerLoop::cueId>},
     {"smpl.loop[N].type", K::loopType, {}, setLoop<&SamplerLoop::type>},
     {"smpl.loop[N].start", K::time, {}, setLoop<&SamplerLoop::start>, true},
     {"smpl.loop[N].end", K::time, {}, setLoop<&SamplerLoop::end>, true},
-    {"smpl.loop[N].fraction", K::integer, {0, kMost32}, setLoop<&SamplerLoop::fraction>},
-    {"smpl.loop[N].playCount", K::integer, {0, kMost32}, setLoop<&SamplerLoop::playCount>},
+    {"smpl.loop[N].fraction", K::integer, kUnsigned32, setLoop<&SamplerLoop::fraction>},
+    {"smpl.loop[N].playCount", K::integer, kUnsigned32, setLoop<&SamplerLoop::playCount>},
     {"smpl.loop[N]", K::none, {}, removeLoop},
     {"smpl", K::none, {}, removeChunk<fourCC("smpl")>},
 
@@ -249,5 +247,5 @@ void checkLoop(MetaEdit& edit, const MetaStep& step)
 
 std::span<const MetaRule> waveRules()
 {
-    return kRules;
+    return kWaveRules;
 }

@@ -7,7 +7,6 @@
 namespace {
 
 constexpr FourCC kIXML = fourCC("iXML");
-constexpr double kNoLimit = 1e9;
 constexpr std::string_view kFresh = "<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n<BWFXML>\n</BWFXML>\n";
 
 bool isAttribute(const MetaName::Part& part)
@@ -89,14 +88,14 @@ void setElement(MetaEdit& edit, const MetaStep& step)
         edit.replace(*chunk, std::move(after));
 }
 
-constexpr MetaRule kRules[] = {
+constexpr MetaRule kXMLRules[] = {
     {"ixml", MetaKind::none, {}, removeChunk<kIXML>},
-    {"ixml.*", MetaKind::text, {0, kNoLimit}, setElement},
+    {"ixml.*", MetaKind::text, kAnyLength, setElement},
 };
 
 } // namespace
 
 std::span<const MetaRule> xmlRules()
 {
-    return kRules;
+    return kXMLRules;
 }

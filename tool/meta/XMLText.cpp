@@ -11,7 +11,7 @@
 
 namespace {
 
-constexpr std::string_view kBlanks = " \t\r\n";
+constexpr std::string_view kXMLBlanks = " \t\r\n";
 
 bool isWellFormed(const std::string& document)
 {
@@ -42,7 +42,7 @@ std::string_view encodingOf(std::string_view document)
 std::size_t scanTag(std::string_view text, std::size_t at, XMLElement& element)
 {
     for (;;) {
-        at = text.find_first_not_of(kBlanks, at);
+        at = text.find_first_not_of(kXMLBlanks, at);
         if (text[at] == '>' || text[at] == '/')
             return text.find('>', at) + 1;
         XMLElement::Attribute attribute;
@@ -140,7 +140,7 @@ std::string XMLText::escaped(std::string_view value, bool isAttribute) const
             continue;
         }
         value.remove_prefix(1);
-        if (static_cast<unsigned char>(c) < 0x20 && kBlanks.find(c) == std::string_view::npos)
+        if (static_cast<unsigned char>(c) < 0x20 && kXMLBlanks.find(c) == std::string_view::npos)
             throw Failure("XML has no control characters");
         if (c == '&' || c == '<' || c == '>' || c == '\r' || (isAttribute && (c == '"' || c == '\n' || c == '\t')))
             text += c == '&'   ? "&amp;"
@@ -195,13 +195,13 @@ void XMLText::addChild(const XMLElement& parent, std::string_view name)
     if (parent.children.empty())
         return change(parent.contentEnd, parent.contentEnd, child);
     const XMLElement& last = parent.children.back();
-    const std::size_t blank = text_.find_last_not_of(kBlanks, last.begin - 1) + 1;
+    const std::size_t blank = text_.find_last_not_of(kXMLBlanks, last.begin - 1) + 1;
     change(last.end, last.end, text_.substr(blank, last.begin - blank) + child);
 }
 
 void XMLText::remove(const XMLElement& element)
 {
-    const std::size_t blank = text_.find_last_not_of(kBlanks, element.begin - 1) + 1;
+    const std::size_t blank = text_.find_last_not_of(kXMLBlanks, element.begin - 1) + 1;
     change(text_[blank - 1] == '>' ? blank : element.begin, element.end, "");
 }
 
@@ -211,7 +211,7 @@ void XMLText::removeAttribute(const XMLElement& element, std::string_view name)
     if (found == element.attributes.end())
         return;
     const std::size_t nameAt = static_cast<std::size_t>(found->name.data() - text_.data());
-    change(text_.find_last_not_of(kBlanks, nameAt - 1) + 1, found->end + 1, "");
+    change(text_.find_last_not_of(kXMLBlanks, nameAt - 1) + 1, found->end + 1, "");
 }
 
 bool isXMLName(std::string_view name)

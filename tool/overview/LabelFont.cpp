@@ -13,10 +13,10 @@
 
 namespace {
 
-constexpr float kDigitHeight = 7; // units
-constexpr float kGap = 1.8F;      // between letters
-constexpr float kStroke = 0.15F;  // of the digit height
-constexpr float kBeyond = 2.6F;   // what accents and descenders take above and below, units
+constexpr float kDigitHeight = 7;  // units
+constexpr float kLetterGap = 1.8F; // between letters
+constexpr float kStroke = 0.15F;   // of the digit height
+constexpr float kBeyond = 2.6F;    // what accents and descenders take above and below, units
 
 struct Point {
     float x, y;
@@ -42,7 +42,7 @@ std::vector<PlacedGlyph> placed(std::string_view text)
             glyphs.back().glyph = markOn(glyphs.back().glyph, mark, isLow);
         } else if (const auto glyph = labelGlyph(character)) {
             glyphs.push_back({*glyph, x});
-            x += glyph->width + kGap;
+            x += glyph->width + kLetterGap;
             isLow = character >= 'a' && character <= 'z';
         }
     }

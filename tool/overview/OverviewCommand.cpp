@@ -264,6 +264,6 @@ void declareOverview(CommandLine& commandLine)
     declareArguments(*verb, arguments);
 }
 
-const VerbRegistration registration{50, "overview", declareOverview};
+const VerbRegistration overviewRegistration{50, "overview", declareOverview};
 
 } // namespace

@@ -89,6 +89,6 @@ void declarePair(CommandLine& commandLine)
     commandLine.addCsv(verb);
 }
 
-const VerbRegistration registration{15, "pair", declarePair};
+const VerbRegistration pairRegistration{15, "pair", declarePair};
 
 } // namespace

@@ -22,7 +22,6 @@ namespace fs = std::filesystem;
 namespace {
 
 constexpr const char* kBackedUp[] = {"ProjectData", "MetaData.plist", "ARA Files"};
-constexpr int kMostBackups = 100; // that two digits name
 
 [[noreturn]] void failWithErrno()
 {

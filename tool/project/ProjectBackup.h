@@ -5,6 +5,8 @@
 
 #include <string>
 
+constexpr int kMostBackups = 100; // that two digits name
+
 /// Copies the project data, with the metadata and the ARA data, to a new backup, which takes its name when it is whole.
 /// Then the oldest go where there are more than `keep`; 0 keeps all. Returns its name, nothing for a dry run. Throws
 /// Failure, also when the backup stands but old ones cannot be deleted.

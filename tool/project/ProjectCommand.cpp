@@ -16,8 +16,6 @@
 
 namespace {
 
-constexpr int kMostBackups = 100; // that two digits name
-
 /// Failures go to standard error, and into the JSON where that is asked for.
 bool runOn(const std::string& path, const OutputOptions& output, const std::function<void()>& work)
 {
@@ -193,6 +191,6 @@ void declareProject(CommandLine& commandLine)
     declareEdits(commandLine, verb, arguments);
 }
 
-const VerbRegistration registration{65, "project", declareProject};
+const VerbRegistration projectRegistration{65, "project", declareProject};
 
 } // namespace

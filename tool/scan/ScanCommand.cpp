@@ -177,6 +177,6 @@ void declareScan(CommandLine& commandLine)
     addThreads(verb, arguments.threads);
 }
 
-const VerbRegistration registration{40, "scan", declareScan};
+const VerbRegistration scanRegistration{40, "scan", declareScan};
 
 } // namespace

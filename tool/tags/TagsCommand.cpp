@@ -96,6 +96,6 @@ void declareTags(CommandLine& commandLine)
     declareTagsCopy(commandLine, verb);
 }
 
-const VerbRegistration registration{30, "tags", declareTags};
+const VerbRegistration tagsRegistration{30, "tags", declareTags};
 
 } // namespace

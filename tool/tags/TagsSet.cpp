@@ -21,12 +21,6 @@ bool isAssigned(const std::vector<TagAssignment>& assignments, const TagField& f
                        [&](const TagAssignment& assignment) { return assignment.field == &field; });
 }
 
-Value valueUnder(const Dictionary& values, const char* key)
-{
-    const auto found = values.find(key);
-    return found == values.end() ? Value() : found->second;
-}
-
 std::string inWords(const Value& value)
 {
     if (const auto* number = value.get<std::int64_t>())

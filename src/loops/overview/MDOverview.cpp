@@ -11,7 +11,7 @@ namespace {
 
 constexpr int kHighest = 127;
 constexpr long kPointFrames = kOverviewFramesPerPoint;
-constexpr platform::SampleFormat kFloats{32, true, false, std::endian::native};
+constexpr platform::SampleFormat kOwnFloats{32, true, false, std::endian::native};
 
 // Lowest and highest so far, zero included; not clamped yet.
 struct Extremes {
@@ -157,7 +157,7 @@ void MDOverview::Add(const float* samples, long start, long frames, int channels
     // Kept: slices, which tell where frames beyond the block's end cease to be counted.
     const long slice = kMostChannels / channels;
     for (long done = 0; done < frames; done += slice)
-        AddStored(samples + std::ptrdiff_t{done} * channels, kFloats, start + done, std::min(slice, frames - done),
+        AddStored(samples + std::ptrdiff_t{done} * channels, kOwnFloats, start + done, std::min(slice, frames - done),
                   channels);
 }
 

@@ -19,7 +19,7 @@ namespace {
 using Flag = StreamDescription::Flag;
 
 constexpr std::uint64_t kMost32 = 0xFFFFFFFF;
-constexpr std::uint64_t kMostSigned = 0x7FFFFFFF;
+constexpr std::uint64_t kMostSigned32 = 0x7FFFFFFF;
 
 std::uint64_t dataSizeOf(const NewContainer& file)
 {
@@ -174,10 +174,10 @@ Bytes headerOfAIFF(const NewContainer& file)
     out.write(file.chunks);
     fillUp(out, file, sizeof(ChkHeader) + soundDataFixedSize);
     out.writeFourCC(fourCC("SSND"));
-    out.write(static_cast<std::uint32_t>(std::min(dataSizeOf(file), kMostSigned) + soundDataFixedSize));
+    out.write(static_cast<std::uint32_t>(std::min(dataSizeOf(file), kMostSigned32) + soundDataFixedSize));
     out.writeZeros(soundDataFixedSize); // offset and block size
     const std::uint64_t formSize = out.size() - 8 + paddedSizeOf(file);
-    if (formSize > kMostSigned)
+    if (formSize > kMostSigned32)
         return {};
     out.patch(formSizeAt, static_cast<std::uint32_t>(formSize));
     return out.take();

@@ -12,15 +12,15 @@ namespace platform {
 
 namespace {
 
-constexpr std::uint32_t kHeaderSize = 7;
-constexpr std::uint32_t kCRCSize = 2;
-static_assert(kHeaderSize == FrameIndex::kHeaderSize);
+constexpr std::uint32_t kADTSHeaderSize = 7;
+constexpr std::uint32_t kADTSCRCSize = 2;
+static_assert(kADTSHeaderSize == FrameIndex::kHeaderSize);
 
 // The first four bytes. Bits: sync 12, version 1, layer 2, no CRC 1, profile 2, rate 4, private 1, channels 3,
 // original 1, home 1, copyright 2, and the high 2 of the length.
 constexpr std::uint32_t kSyncMask = 0xFFF60000;
 constexpr std::uint32_t kSync = 0xFFF00000;
-constexpr std::uint32_t kKindMask = 0xFFF6FDC0; // sync, layer, profile, rate, channels
+constexpr std::uint32_t kADTSKindMask = 0xFFF6FDC0; // sync, layer, profile, rate, channels
 constexpr std::uint32_t kNoCRC = 0x00010000;
 
 /// The length of a frame, header included; 0 when it is none.
@@ -28,7 +28,7 @@ std::uint32_t frameSize(const std::byte* header)
 {
     const auto bits = loadBE<std::uint32_t>(header);
     const std::uint32_t size = (bits & 3) << 11 | loadBE<std::uint16_t>(header + 4) >> 5;
-    const bool isFrame = (bits & kSyncMask) == kSync && size > kHeaderSize + (bits & kNoCRC ? 0 : kCRCSize);
+    const bool isFrame = (bits & kSyncMask) == kSync && size > kADTSHeaderSize + (bits & kNoCRC ? 0 : kADTSCRCSize);
     return isFrame ? size : 0;
 }
 
@@ -42,18 +42,18 @@ std::uint32_t blocksBehindFirst(const std::byte* header)
 std::unique_ptr<PacketSource> ADTSPackets::open(std::unique_ptr<PacketFile>& file, std::int32_t& status)
 {
     const std::uint64_t start = endOfLeadingTags(*file);
-    const BytesView bytes = file->at(start, FrameIndex::kLargestFrame + kHeaderSize);
-    const std::uint32_t size = bytes.size() >= kHeaderSize ? frameSize(bytes.data()) : 0;
+    const BytesView bytes = file->at(start, FrameIndex::kLargestFrame + kADTSHeaderSize);
+    const std::uint32_t size = bytes.size() >= kADTSHeaderSize ? frameSize(bytes.data()) : 0;
     // Another frame of the kind follows, or the end.
     const bool isOne = size > 0 && (bytes.size() == size ||
-                                    (bytes.size() >= size + kHeaderSize && frameSize(bytes.data() + size) > 0 &&
-                                     (loadBE<std::uint32_t>(bytes.data()) & kKindMask) ==
-                                         (loadBE<std::uint32_t>(bytes.data() + size) & kKindMask)));
+                                    (bytes.size() >= size + kADTSHeaderSize && frameSize(bytes.data() + size) > 0 &&
+                                     (loadBE<std::uint32_t>(bytes.data()) & kADTSKindMask) ==
+                                         (loadBE<std::uint32_t>(bytes.data() + size) & kADTSKindMask)));
     status = file->takeStatus(isOne);
     if (status != kStatusOK)
         return nullptr;
-    std::array<std::byte, kHeaderSize> header;
-    std::copy_n(bytes.begin(), kHeaderSize, header.begin());
+    std::array<std::byte, kADTSHeaderSize> header;
+    std::copy_n(bytes.begin(), kADTSHeaderSize, header.begin());
     std::unique_ptr<ADTSPackets> packets(new ADTSPackets(std::move(file), start, header.data()));
     status = packets->makeFormat();
     if (status == kStatusOK)
@@ -63,9 +63,9 @@ std::unique_ptr<PacketSource> ADTSPackets::open(std::unique_ptr<PacketFile>& fil
 
 ADTSPackets::ADTSPackets(std::unique_ptr<PacketFile> file, std::uint64_t start, const std::byte* firstHeader)
     : file_(std::move(file)),
-      kind_(loadBE<std::uint32_t>(firstHeader) & kKindMask),
+      kind_(loadBE<std::uint32_t>(firstHeader) & kADTSKindMask),
       index_(*file_, start, startOfTrailingTags(*file_, start), [this](const std::byte* header) -> std::uint32_t {
-          if ((loadBE<std::uint32_t>(header) & kKindMask) != kind_)
+          if ((loadBE<std::uint32_t>(header) & kADTSKindMask) != kind_)
               return 0;
           hasSeveralBlocks_ = hasSeveralBlocks_ || blocksBehindFirst(header) > 0;
           return frameSize(header);
@@ -107,9 +107,9 @@ std::int32_t ADTSPackets::read(std::uint64_t packet, Bytes& bytes)
     FrameIndex::Place place;
     if (const std::int32_t status = index_.find(packet, place); status != kStatusOK)
         return status;
-    const BytesView header = file_->at(place.position, kHeaderSize); // it was found by these bytes
+    const BytesView header = file_->at(place.position, kADTSHeaderSize); // it was found by these bytes
     const bool hasCRC = (loadBE<std::uint32_t>(header.data()) & kNoCRC) == 0;
-    const std::uint32_t headerSize = kHeaderSize + (hasCRC ? kCRCSize : 0);
+    const std::uint32_t headerSize = kADTSHeaderSize + (hasCRC ? kADTSCRCSize : 0);
     return file_->read(place.position + headerSize, place.size - headerSize, bytes);
 }
 

@@ -15,16 +15,16 @@ namespace platform {
 
 namespace {
 
-struct Kind {
+struct EndKind {
     FourCC fileType;
     std::int32_t (*read)(PacketFile& file, CompressedAudio& audio);
 };
-constexpr Kind kKinds[] = {
+constexpr EndKind kKinds[] = {
     {fourCC("ogg "), readOggInfo}, {fourCC("ac-3"), readAC3Info},     {fourCC("MPG2"), readLayerIIInfo},
     {fourCC("tta "), readTTAInfo}, {fourCC("wvpk"), readWavPackInfo},
 };
 
-std::int32_t describe(const Kind& kind, const std::string& path, CompressedAudio& audio)
+std::int32_t describe(const EndKind& kind, const std::string& path, CompressedAudio& audio)
 {
     FileStatus found;
     const int descriptor = systemCalls().openFile(path.c_str(), OpenFor::reading, &found);
@@ -37,7 +37,7 @@ std::int32_t describe(const Kind& kind, const std::string& path, CompressedAudio
 
 /// Whether the file beside it that corrects a lossy one, if there is one, is as whole: of one that is broken no sound
 /// may come.
-bool isCorrected(const Kind& kind, const std::string& path, std::uint64_t frames)
+bool isCorrected(const EndKind& kind, const std::string& path, std::uint64_t frames)
 {
     CompressedAudio corrections;
     const std::int32_t status =
@@ -49,7 +49,7 @@ bool isCorrected(const Kind& kind, const std::string& path, std::uint64_t frames
 
 std::int32_t describeByEnds(const std::string& path, FourCC fileType, CompressedAudio& audio)
 {
-    const auto* const kind = std::ranges::find(kKinds, fileType, &Kind::fileType);
+    const auto* const kind = std::ranges::find(kKinds, fileType, &EndKind::fileType);
     if (kind == std::end(kKinds))
         return AudioHandle::kFormatNotSupported;
     const std::int32_t status = describe(*kind, path, audio);

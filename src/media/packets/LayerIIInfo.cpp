@@ -9,12 +9,12 @@ namespace platform {
 
 namespace {
 
-constexpr std::size_t kHeaderSize = 4;
-constexpr std::uint32_t kFramesInOne = 1152;
+constexpr std::size_t kLayerIIHeaderSize = 4;
+constexpr std::uint32_t kLayerIIFrames = 1152;
 
 // Bits: sync 12, MPEG-1 1, layer 2, no CRC 1, bit rate 4, sample rate 2, padding 1, private 1, mode 2, …, emphasis 2
 constexpr std::uint32_t kLayerMask = 0xFFF60000, kLayerII = 0xFFF40000;
-constexpr std::uint32_t kKindMask = 0xFFFE0C00; // sync, version, layer, sample rate
+constexpr std::uint32_t kLayerIIKindMask = 0xFFFE0C00; // sync, version, layer, sample rate
 // And mode, copyright, original, emphasis: a demultiplexer that looks for a stream skips a first frame that has not
 // these in common with the second.
 constexpr std::uint32_t kStartMask = 0xFFFE0CCF;
@@ -42,7 +42,7 @@ std::uint32_t frameSize(std::uint32_t header)
     const std::uint32_t rate = sampleRateOf(header), bitRate = bitRates[header >> 19 & 1][header >> 12 & 15];
     if ((header & kLayerMask) != kLayerII || rate == 0 || bitRate == 0)
         return 0;
-    return kFramesInOne / 8 * 1000 * bitRate / rate + (header >> 9 & 1);
+    return kLayerIIFrames / 8 * 1000 * bitRate / rate + (header >> 9 & 1);
 }
 
 } // namespace
@@ -53,11 +53,11 @@ std::int32_t readLayerIIInfo(PacketFile& file, CompressedAudio& audio)
     std::uint32_t first = 0;
     std::uint64_t count = 0, at = 0;
     for (; at < file.length(); ++count) {
-        const BytesView bytes = file.at(at, kHeaderSize);
-        const std::uint32_t header = bytes.size() == kHeaderSize ? loadBE<std::uint32_t>(bytes.data()) : 0;
+        const BytesView bytes = file.at(at, kLayerIIHeaderSize);
+        const std::uint32_t header = bytes.size() == kLayerIIHeaderSize ? loadBE<std::uint32_t>(bytes.data()) : 0;
         const std::uint32_t size = frameSize(header);
         first = count == 0 ? header : first;
-        const std::uint32_t alike = count == 1 ? kStartMask : kKindMask;
+        const std::uint32_t alike = count == 1 ? kStartMask : kLayerIIKindMask;
         if (size == 0 || ((header ^ first) & alike) != 0 || isMono(header) != isMono(first))
             return file.takeStatus(false);
         at += size;
@@ -69,8 +69,8 @@ std::int32_t readLayerIIInfo(PacketFile& file, CompressedAudio& audio)
     audio.format.formatId = fourCC(".mp2");
     audio.format.sampleRate = sampleRateOf(first);
     audio.format.channelsPerFrame = isMono(first) ? 1 : 2;
-    audio.format.framesPerPacket = kFramesInOne;
-    audio.frames = count * kFramesInOne;
+    audio.format.framesPerPacket = kLayerIIFrames;
+    audio.frames = count * kLayerIIFrames;
     audio.facts.speakers = isMono(first) ? 0x4 : 0x3;
     return kStatusOK;
 }

@@ -14,7 +14,7 @@ namespace platform {
 
 namespace {
 
-constexpr std::size_t kLargestCookie = 4096;
+constexpr std::size_t kLargestM4ACookie = 4096;
 
 bool isMovie(PacketFile& file)
 {
@@ -138,7 +138,7 @@ std::int32_t M4APackets::readSampleEntry(const MP4Box& descriptions)
         if (const auto wave = MP4Boxes(*file_, entry, fieldsSize).find(fourCC("wave")))
             box = MP4Boxes(*file_, *wave).find(wanted);
     constexpr std::uint64_t kVersionSize = 4; // version and flags
-    if (!box || box->size() < kVersionSize || box->size() > kLargestCookie)
+    if (!box || box->size() < kVersionSize || box->size() > kLargestM4ACookie)
         return kStatusIOError;
     const std::uint64_t size = box->size() - kVersionSize;
     if (const std::int32_t status = file_->read(box->body + kVersionSize, size, cookie_); status != kStatusOK)

@@ -58,9 +58,9 @@ std::optional<MP4Box> child(PacketFile& file, const MP4Box& box, FourCC type)
     return MP4Boxes(file, box).find(type);
 }
 
-class Reader {
+class TableReader {
 public:
-    Reader(PacketFile& file, const MP4Box& box, SampleTable& table) : file_(file), box_(box), table_(table) {}
+    TableReader(PacketFile& file, const MP4Box& box, SampleTable& table) : file_(file), box_(box), table_(table) {}
 
     std::int32_t run()
     {
@@ -220,7 +220,7 @@ std::uint64_t SampleTable::statedDuration() const
 std::int32_t SampleTable::read(PacketFile& file, const MP4Box& box, SampleTable& table)
 {
     table = {};
-    return Reader(file, box, table).run();
+    return TableReader(file, box, table).run();
 }
 
 } // namespace platform

@@ -16,7 +16,7 @@ namespace platform {
 
 namespace {
 
-std::int32_t failure()
+std::int32_t statusOfError()
 {
     const std::int32_t status = PosixErrorToOSErr();
     return status != kStatusOK ? status : kStatusIOError;
@@ -64,7 +64,7 @@ std::unique_ptr<AudioFile> AudioFile::openAny(const URL& url, Permission permiss
     if (descriptor < 0)
         descriptor = systemCalls().openFile(path.c_str(), access, &found);
     if (descriptor < 0) {
-        result = failure();
+        result = statusOfError();
         return nullptr;
     }
     auto implementation = std::make_unique<Implementation>(descriptor, permission);
@@ -92,11 +92,11 @@ std::unique_ptr<AudioFile> AudioFile::create(const URL& url, FourCC fileType, co
         return nullptr;
     }
     int descriptor = systemCalls().createFile(path.c_str(), 0666);
-    result = descriptor < 0 ? failure() : kStatusOK;
+    result = descriptor < 0 ? statusOfError() : kStatusOK;
     const bool isThere = result == kStatusDuplicateName && (flags & eraseExisting);
     if (isThere) {
         descriptor = systemCalls().openFile(path.c_str(), OpenFor::readingAndWriting, nullptr);
-        result = descriptor < 0 ? failure() : kStatusOK;
+        result = descriptor < 0 ? statusOfError() : kStatusOK;
     }
     if (result != kStatusOK)
         return nullptr;

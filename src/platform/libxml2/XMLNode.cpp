@@ -9,7 +9,7 @@ namespace platform {
 
 namespace {
 
-std::string_view viewOf(const xmlChar* text)
+std::string_view textViewOf(const xmlChar* text)
 {
     return text == nullptr ? std::string_view() : reinterpret_cast<const char*>(text);
 }
@@ -25,8 +25,8 @@ std::string nameOf(const xmlChar* name, const xmlNs* space)
 {
     std::string written;
     if (space != nullptr && space->prefix != nullptr)
-        (written = viewOf(space->prefix)) += ':';
-    return written += viewOf(name);
+        (written = textViewOf(space->prefix)) += ':';
+    return written += textViewOf(name);
 }
 
 /// The text below a node of the library; entities of the tree's own are replaced.
@@ -34,7 +34,7 @@ std::string contentOf(const void* node)
 {
     const std::unique_ptr<xmlChar, void (*)(void*)> content(xmlNodeGetContent(static_cast<const xmlNode*>(node)),
                                                             [](void* text) { xmlFree(text); });
-    return std::string(viewOf(content.get()));
+    return std::string(textViewOf(content.get()));
 }
 
 template <class Node>

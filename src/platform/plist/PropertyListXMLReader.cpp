@@ -9,9 +9,9 @@ namespace platform::plist {
 namespace {
 
 /// Hands the events of a document to a Builder, and ends the parse when it fails.
-class Reader final : public XMLHandler {
+class XMLReader final : public XMLHandler {
 public:
-    Reader(InputStream& stream, PropertyListReading reading) : builder_(reading), parser_(stream, *this)
+    XMLReader(InputStream& stream, PropertyListReading reading) : builder_(reading), parser_(stream, *this)
     {
         parser_.setMaximumDepth(kPropertyListMaximumDepth + 2); // "plist" around them all, a leaf within
     }
@@ -53,7 +53,7 @@ private:
 bool readXML(BytesView bytes, Value& value, std::string& problem, PropertyListReading reading)
 {
     BorrowedInputStream stream(bytes);
-    return Reader(stream, reading).read(value, problem);
+    return XMLReader(stream, reading).read(value, problem);
 }
 
 } // namespace platform::plist

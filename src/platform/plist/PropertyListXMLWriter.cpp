@@ -12,9 +12,9 @@ namespace platform::plist {
 namespace {
 
 /// Writes the text line by line, a tab per level.
-class Writer {
+class XMLWriter {
 public:
-    explicit Writer(std::string& problem) : problem_(problem) {}
+    explicit XMLWriter(std::string& problem) : problem_(problem) {}
     bool write(const Value& value, Bytes& bytes);
 
 private:
@@ -49,7 +49,7 @@ private:
     std::string& problem_;
 };
 
-bool Writer::write(const Value& value, Bytes& bytes)
+bool XMLWriter::write(const Value& value, Bytes& bytes)
 {
     line(0, "<?xml version=\"1.0\" encoding=\"UTF-8\"?>");
     line(0, "<plist version=\"1.0\">");
@@ -61,7 +61,7 @@ bool Writer::write(const Value& value, Bytes& bytes)
     return true;
 }
 
-bool Writer::writeValue(const Value& value, std::size_t depth)
+bool XMLWriter::writeValue(const Value& value, std::size_t depth)
 {
     if (const auto* text = value.get<std::string>())
         return writeText(depth, "string", *text);
@@ -84,7 +84,7 @@ bool Writer::writeValue(const Value& value, std::size_t depth)
     return true;
 }
 
-bool Writer::writeArray(const Array& array, std::size_t depth)
+bool XMLWriter::writeArray(const Array& array, std::size_t depth)
 {
     if (depth == std::size_t{kPropertyListMaximumDepth})
         return fail("it is nested too deeply");
@@ -100,7 +100,7 @@ bool Writer::writeArray(const Array& array, std::size_t depth)
     return true;
 }
 
-bool Writer::writeDictionary(const Dictionary& dictionary, std::size_t depth)
+bool XMLWriter::writeDictionary(const Dictionary& dictionary, std::size_t depth)
 {
     if (depth == std::size_t{kPropertyListMaximumDepth})
         return fail("it is nested too deeply");
@@ -116,7 +116,7 @@ bool Writer::writeDictionary(const Dictionary& dictionary, std::size_t depth)
     return true;
 }
 
-bool Writer::writeText(std::size_t depth, std::string_view element, const std::string& text)
+bool XMLWriter::writeText(std::size_t depth, std::string_view element, const std::string& text)
 {
     indent(depth);
     ((out_ += '<') += element) += '>';
@@ -126,7 +126,7 @@ bool Writer::writeText(std::size_t depth, std::string_view element, const std::s
     return true;
 }
 
-bool Writer::writeEscaped(const std::string& text)
+bool XMLWriter::writeEscaped(const std::string& text)
 {
     if (String::fromUTF8(text).isNull())
         return fail("a text is not UTF-8");
@@ -149,7 +149,7 @@ bool Writer::writeEscaped(const std::string& text)
     return true;
 }
 
-bool Writer::writeDate(std::size_t depth, Date date)
+bool XMLWriter::writeDate(std::size_t depth, Date date)
 {
     using namespace std::chrono;
     constexpr sys_seconds epoch = sys_days(year(2001) / January / 1);
@@ -171,7 +171,7 @@ bool Writer::writeDate(std::size_t depth, Date date)
     return true;
 }
 
-void Writer::writeReal(std::size_t depth, double real)
+void XMLWriter::writeReal(std::size_t depth, double real)
 {
     // The shortest text that reads back as the same number, whatever the locale; "inf" and "nan" are understood.
     std::array<char, 64> text{};
@@ -179,7 +179,7 @@ void Writer::writeReal(std::size_t depth, double real)
     leaf(depth, "real", {text.data(), static_cast<std::size_t>(result.ptr - text.data())});
 }
 
-void Writer::writeData(std::size_t depth, const Bytes& data)
+void XMLWriter::writeData(std::size_t depth, const Bytes& data)
 {
     constexpr char digits[] = "ABCDEFGHIJKLMNOPQRSTUVWXYZabcdefghijklmnopqrstuvwxyz0123456789+/";
     constexpr std::size_t bytesPerLine = 57; // 76 characters
@@ -205,7 +205,7 @@ void Writer::writeData(std::size_t depth, const Bytes& data)
 
 bool writeXML(const Value& value, Bytes& bytes, std::string& problem)
 {
-    return Writer(problem).write(value, bytes);
+    return XMLWriter(problem).write(value, bytes);
 }
 
 } // namespace platform::plist

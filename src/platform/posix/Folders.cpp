@@ -19,7 +19,7 @@ namespace {
 constexpr std::uint32_t kFolderPermissions = 0777; // less the process's mask
 constexpr std::int64_t kUnixTimeOf2001 = 978307200;
 
-struct CloseFolder {
+struct CloseDirectory {
     void operator()(DIR* folder) const { ::closedir(folder); }
 };
 
@@ -43,7 +43,7 @@ struct Removal {
 
 std::optional<std::vector<std::string>> namesInFolder(const std::string& path)
 {
-    const std::unique_ptr<DIR, CloseFolder> folder(::opendir(path.c_str()));
+    const std::unique_ptr<DIR, CloseDirectory> folder(::opendir(path.c_str()));
     if (!folder)
         return std::nullopt;
     std::vector<std::string> names;

@@ -41,7 +41,7 @@ std::string joined(const std::string& folder, const char* name)
 }
 
 /// A folder to look through. `device` is that of the folder from which the walk began; a beginning has none yet.
-struct Waiting {
+struct WaitingFolder {
     std::string path;
     std::optional<dev_t> device;
 };
@@ -61,7 +61,7 @@ public:
     std::optional<std::string> run()
     {
         while (!waiting_.empty() && entriesLeft_ > 0) {
-            const Waiting next = std::move(waiting_.front());
+            const WaitingFolder next = std::move(waiting_.front());
             waiting_.pop_front();
             if (auto found = lookThrough(next))
                 return found;
@@ -70,7 +70,7 @@ public:
     }
 
 private:
-    std::optional<std::string> lookThrough(const Waiting& waiting)
+    std::optional<std::string> lookThrough(const WaitingFolder& waiting)
     {
         const bool isBeginning = !waiting.device.has_value();
         const OpenFolder folder = openFolder(waiting.path, isBeginning ? 0 : O_NOFOLLOW);
@@ -112,7 +112,7 @@ private:
     const std::vector<std::string>& folders_;
     SearchDepth depth_;
     std::size_t entriesLeft_;
-    std::deque<Waiting> waiting_;
+    std::deque<WaitingFolder> waiting_;
 };
 
 } // namespace

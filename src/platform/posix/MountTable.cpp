@@ -12,7 +12,7 @@ namespace platform {
 namespace {
 
 /// Space, tab, newline and backslash stand as "\ooo".
-std::string unescaped(std::string_view text)
+std::string withoutOctals(std::string_view text)
 {
     std::string plain;
     for (std::size_t i = 0; i < text.size(); ++i) {
@@ -54,8 +54,8 @@ std::optional<Mount> mountFromLine(std::string_view line)
         return std::nullopt;
     for (std::size_t i = firstOptional; i + 1 < fields.size(); ++i)
         if (fields[i] == "-") {
-            mount.folder = unescaped(fields[folder]);
-            mount.fileSystem = unescaped(fields[i + 1]);
+            mount.folder = withoutOctals(fields[folder]);
+            mount.fileSystem = withoutOctals(fields[i + 1]);
             return mount;
         }
     return std::nullopt;

@@ -16,7 +16,7 @@ namespace {
 /// Files hold the same bits; decoders of floats round; judges write 16 or 24 bits.
 constexpr float kSame = 0, kRounded = 1e-5F, k16Bits = 1.01F / 32768;
 /// Opus settles after a seek, but its decoder never wholly forgets.
-constexpr float kSettled = 1e-5F;
+constexpr float kSettledAfterSeek = 1e-5F;
 
 struct Case {
     const char* name;
@@ -57,14 +57,16 @@ const Case cases[] = {
     // oggdec puts the low frequencies between the rear channels.
     {"VorbisSurround", "oggenc -Q -q5 source.wav -o a.ogg", kOgg,
      "oggdec -Q a.ogg -o o.wav && sox -D o.wav judged.wav remix 1 2 3 5 6 4", k16Bits, 48000, 6},
-    {"OpusLow", "opusenc --quiet --bitrate 32 source.wav a.opus", kOpus, kOpusDec, kSame, 48000, 2, 16, kSettled},
+    {"OpusLow", "opusenc --quiet --bitrate 32 source.wav a.opus", kOpus, kOpusDec, kSame, 48000, 2, 16,
+     kSettledAfterSeek},
     {"OpusMiddle", "opusenc --quiet --bitrate 96 --framesize 60 source.wav a.opus", kOpus, kOpusDec, kSame, 44100, 2,
-     16, kSettled},
+     16, kSettledAfterSeek},
     {"OpusHigh", "opusenc --quiet --hard-cbr --bitrate 256 --framesize 2.5 source.wav a.opus", kOpus, kOpusDec, kSame,
-     48000, 2, 24, kSettled},
+     48000, 2, 24, kSettledAfterSeek},
     {"OpusSpeech", "opusenc --quiet --speech --bitrate 12 source.wav a.opus", kOpus, kOpusDec, kSame, 8000, 1, 16,
-     kSettled},
-    {"OpusSurround", "opusenc --quiet --bitrate 320 source.wav a.opus", kOpus, kOpusDec, kSame, 48000, 6, 16, kSettled},
+     kSettledAfterSeek},
+    {"OpusSurround", "opusenc --quiet --bitrate 320 source.wav a.opus", kOpus, kOpusDec, kSame, 48000, 6, 16,
+     kSettledAfterSeek},
     {"WavPack", "wavpack -q source.wav -o a.wv", kWavPack, kWvUnpack},
     {"WavPackHigh24", "wavpack -q -h source.wav -o a.wv", kWavPack, kWvUnpack, kSame, 96000, 2, 24},
     {"WavPackExtra24", "wavpack -q -x3 source.wav -o a.wv", kWavPack, kWvUnpack, kSame, 44100, 2, 24},

@@ -1,6 +1,7 @@
 #include "Sounds.h"
 
 #include "media/userdata/AudioFileService.h"
+#include "support/URLs.h"
 
 #include <gtest/gtest.h>
 
@@ -9,15 +10,6 @@
 #include <numbers>
 
 using namespace platform;
-
-namespace {
-
-URLRef urlOf(const std::string& path)
-{
-    return URL::createWithFileSystemPath(String::fromUTF8(path), PathStyle::posix, false);
-}
-
-} // namespace
 
 std::vector<float> sound(std::uint32_t frames, std::uint32_t channels, double sampleRate)
 {

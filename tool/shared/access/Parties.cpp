@@ -79,7 +79,7 @@ void addTo(Processes& processes, int id)
     processes.try_emplace(id, fmt::format("{} ({})", id, printable(processName(id))));
 }
 
-std::string textOf(const Processes& processes)
+std::string wordsFor(const Processes& processes)
 {
     if (processes.empty())
         return "another process";
@@ -158,7 +158,7 @@ std::string blockersText(const platform::CoordinatedItem& item, bool isWriting)
     for (const platform::CoordinationParty& party : platform::coordinationParties(item))
         if (isInTheWay(party, isWriting))
             addTo(blockers, party.processID);
-    return textOf(blockers);
+    return wordsFor(blockers);
 }
 
 std::string lockersText(int descriptor)
@@ -171,7 +171,7 @@ std::string lockersText(int descriptor)
             kind = std::max(kind, one);
         }
     const char* const verb = lockers.size() > 1 ? "have" : "has";
-    return fmt::format("{}, which {} locked it{}", textOf(lockers), verb,
+    return fmt::format("{}, which {} locked it{}", wordsFor(lockers), verb,
                        kind == FileLockKind::read ? " for reading" : "");
 }
 

@@ -12,7 +12,7 @@
 
 namespace {
 
-std::string textOf(const FileProblem& problem)
+std::string sentenceOn(const FileProblem& problem)
 {
     using Kind = FileProblem::Kind;
     const std::string why = systemErrorText(problem.systemError);
@@ -92,7 +92,7 @@ std::string shortText(FourCC id)
     return text;
 }
 
-std::string textOf(const ContainerProblem& problem)
+std::string sentenceOn(const ContainerProblem& problem)
 {
     using Kind = ContainerProblem::Kind;
     switch (problem.kind) {
@@ -142,7 +142,7 @@ std::string textOf(const ContainerProblem& problem)
     return "";
 }
 
-std::string textOf(const ContainerTail& tail)
+std::string sentenceOn(const ContainerTail& tail)
 {
     using Fault = ContainerTail::Fault;
     const bool isCAF = tail.extent.id == kCaff;
@@ -172,7 +172,7 @@ std::string textOf(const ContainerTail& tail)
                                tail.extent.end, tail.stray);
 }
 
-std::optional<std::string> textOf(const ChunkObjection& objection, FourCC id)
+std::optional<std::string> sentenceOn(const ChunkObjection& objection, FourCC id)
 {
     using Kind = ChunkObjection::Kind;
     switch (objection.kind) {
@@ -184,7 +184,7 @@ std::optional<std::string> textOf(const ChunkObjection& objection, FourCC id)
     case Kind::soundLost:
         return fmt::format("the chunk \"{}\" describes or holds its sound, which would be lost", fourCCText(id));
     case Kind::tail:
-        return textOf(objection.tail);
+        return sentenceOn(objection.tail);
     }
     return std::nullopt;
 }
@@ -194,16 +194,16 @@ std::optional<std::string> textOf(const ChunkObjection& objection, FourCC id)
 void requireNone(const FileProblem& problem)
 {
     if (problem)
-        throw Failure(textOf(problem));
+        throw Failure(sentenceOn(problem));
 }
 
 void requireNone(const ContainerProblem& problem)
 {
     using Kind = ContainerProblem::Kind;
     if (problem.kind == Kind::empty || problem.kind == Kind::unknown)
-        throw OtherKind(textOf(problem), OtherKind::Kind::unknown);
+        throw OtherKind(sentenceOn(problem), OtherKind::Kind::unknown);
     if (problem)
-        throw Failure(textOf(problem));
+        throw Failure(sentenceOn(problem));
 }
 
 ChunkSurvey surveyChunks(CAudioFileIO& file, FourCC id)
@@ -227,12 +227,12 @@ std::optional<std::string> objectionToAdding(CAudioFileIO& file, const ChunkSurv
 {
     ChunkObjection objection;
     requireNone(ObjectToAdding(file, survey, id, objection));
-    return textOf(objection, id);
+    return sentenceOn(objection, id);
 }
 
 std::optional<std::string> objectionToRemoving(const ChunkSurvey& survey, FourCC id)
 {
-    return textOf(ObjectionToRemoving(survey, id), id);
+    return sentenceOn(ObjectionToRemoving(survey, id), id);
 }
 
 void synchronize(int descriptor)

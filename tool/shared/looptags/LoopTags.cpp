@@ -292,6 +292,12 @@ TagText tagTextCalled(std::string_view name)
     return std::ranges::find_if(kShownTags, [&](const ShownTag& each) { return each.name == name; })->text;
 }
 
+platform::Value valueUnder(const platform::Dictionary& values, const char* key)
+{
+    const auto found = values.find(key);
+    return found == values.end() ? platform::Value() : found->second;
+}
+
 bool isAbsent(const platform::Value& value)
 {
     if (const auto* number = value.get<std::int64_t>())

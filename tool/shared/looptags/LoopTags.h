@@ -88,6 +88,8 @@ struct TagValue {
     std::string name;
     platform::Value value;
 };
+/// The value under a key; null when there is none.
+platform::Value valueUnder(const platform::Dictionary& values, const char* key);
 /// Null and zero, empty texts and empty lists are no tag.
 bool isAbsent(const platform::Value& value);
 /// All tags that are present, in the order of output; not the transients and the chunks.

@@ -12,7 +12,7 @@ using platform::AudioFile;
 
 namespace {
 
-constexpr FourCC kInfo = fourCC("info");
+constexpr FourCC kInfoChunk = fourCC("info");
 
 // The item at an index; none when there is none. What cannot be read is no item that is not there.
 std::optional<Bytes> item(AudioFile& file, FourCC type, std::uint32_t index)
@@ -55,7 +55,7 @@ bool writeItem(AudioFile& file, FourCC id, const std::optional<Bytes>& before, c
 {
     if (before == after)
         return true;
-    const bool byUUID = file.fileType() == kCaff && id != kInfo;
+    const bool byUUID = file.fileType() == kCaff && id != kInfoChunk;
     if (byUUID) {
         const tagging::UUIDBytes& uuid = *chunkIDToCafChunkUUID(id);
         return after ? VireoLoopUUIDUserDataUtils::write(file, uuid, *after)
@@ -76,7 +76,7 @@ std::vector<FourCC> textIDs(FourCC fileType)
         return {fourCC("acid"), fourCC("smpl")};
     if (fileType == kAIFF)
         return {fourCC("NAME"), fourCC("AUTH"), fourCC("(c) "), fourCC("COMT")};
-    return {kInfo};
+    return {kInfoChunk};
 }
 
 } // namespace

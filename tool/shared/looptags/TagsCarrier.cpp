@@ -17,12 +17,6 @@ namespace {
 
 const char* const kNoText = " (it is no UTF-8 text)";
 
-Value valueUnder(const platform::Dictionary& values, const char* key)
-{
-    const auto found = values.find(key);
-    return found == values.end() ? Value() : found->second;
-}
-
 std::string cut(const std::string& text)
 {
     constexpr std::size_t most = 60;

@@ -14,6 +14,13 @@
 #include <string_view>
 #include <vector>
 
+/// A number that is unknown when it is zero or less, as knownMember() takes it.
+template <class Number>
+std::optional<Number> positive(Number number)
+{
+    return number > 0 ? std::optional(number) : std::nullopt;
+}
+
 /// Commas and escapes are its own business; what belongs where is the caller's. Without line breaks but for those that
 /// are asked for.
 class JsonWriter {

@@ -1,6 +1,7 @@
 // ADM documents: parsing against bare libxml2, which is pushed the same bytes and calls functions that do nothing;
 // looking IDs up; and the command.
 #include "ADMDocuments.h"
+#include "Timing.h"
 #include "adm/ADMDocument.h"
 
 #include <benchmark/benchmark.h>
@@ -212,10 +213,6 @@ void FindADMElement(benchmark::State& state)
         read.push_back(dependentRead(count));
         state.SetIterationTime(found.back() * 1e-9);
     }
-    const auto median = [](std::vector<double>& values) {
-        std::nth_element(values.begin(), values.begin() + std::ssize(values) / 2, values.end());
-        return values[values.size() / 2];
-    };
     const double one = median(read);
     state.counters["dependent_read_ns"] = one;
     state.counters["find_ns"] = median(found);

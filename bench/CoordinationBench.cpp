@@ -1,6 +1,7 @@
 // Coordinated access and locks, beside the bare system calls that do a part of it. Ratios are of one run; see
 // bench/README.md.
 #include "CoordinationPlace.h"
+#include "Timing.h"
 
 #include <benchmark/benchmark.h>
 #include <sqlite3.h>
@@ -44,10 +45,6 @@ void compare(benchmark::State& state, const std::function<void()>& reference, co
         mine.push_back(seconds(kBurst, ours));
         state.SetIterationTime(mine.back());
     }
-    const auto median = [](std::vector<double>& values) {
-        std::nth_element(values.begin(), values.begin() + static_cast<std::ptrdiff_t>(values.size() / 2), values.end());
-        return values[values.size() / 2];
-    };
     state.counters["reference_us"] = median(theirs) / kBurst * 1e6;
     state.counters["us"] = median(mine) / kBurst * 1e6;
     state.counters["ratio"] = median(mine) / median(theirs);

@@ -1,5 +1,6 @@
 // An hour of compressed sound decoded from end to end beside the ffmpeg command, places in it found, and what a process
 // pays for the library that never meets any.
+#include "Timing.h"
 #include "audiofile/XStream.h"
 
 #include <benchmark/benchmark.h>
@@ -21,13 +22,6 @@ extern char** environ;
 namespace {
 
 constexpr std::uint32_t kBlock = 4096;
-
-double seconds(const auto& work)
-{
-    const auto begin = std::chrono::steady_clock::now();
-    work();
-    return std::chrono::duration<double>(std::chrono::steady_clock::now() - begin).count();
-}
 
 /// Twelve times the same five minutes, made once and removed when the process ends.
 class Hours {
@@ -172,16 +166,6 @@ private:
     std::filesystem::path folder_;
 };
 
-double processorTimeOfChildren()
-{
-    rusage used{};
-    getrusage(RUSAGE_CHILDREN, &used);
-    const auto seconds = [](const timeval& time) {
-        return static_cast<double>(time.tv_sec) + 1e-6 * static_cast<double>(time.tv_usec);
-    };
-    return seconds(used.ru_utime) + seconds(used.ru_stime);
-}
-
 /// Half an hour to 24-bit AIFF, and to 48 kHz, by the command beside sox and ffmpeg, in turns. Ours is committed to
 /// storage at the end, theirs is not.
 void BM_DecodeHalfHour(benchmark::State& state)
@@ -196,20 +180,15 @@ void BM_DecodeHalfHour(benchmark::State& state)
     std::vector<double> wall[3], processor[3];
     for (auto _ : state)
         for (std::size_t i = 0; i < 3; ++i) {
-            const double before = processorTimeOfChildren();
+            const double before = processorSecondsOfChildren();
             wall[i].push_back(seconds([&] {
                 if (HalfHour::shared().run(commands[i]) != 0)
                     state.SkipWithError("a command failed");
             }));
-            processor[i].push_back(processorTimeOfChildren() - before);
+            processor[i].push_back(processorSecondsOfChildren() - before);
             if (i == 0)
                 state.SetIterationTime(wall[i].back());
         }
-    const auto median = [](std::vector<double> times) {
-        const auto middle = times.begin() + static_cast<std::ptrdiff_t>(times.size() / 2);
-        std::nth_element(times.begin(), middle, times.end());
-        return *middle;
-    };
     state.counters["cpu_s"] = median(processor[0]);
     state.counters["cpu_of_sox"] = median(processor[0]) / median(processor[1]);    // to AIFF at most 0.6
     state.counters["cpu_of_ffmpeg"] = median(processor[0]) / median(processor[2]); // to 48 kHz at most 1.2

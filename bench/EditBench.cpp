@@ -1,5 +1,6 @@
 // Edits in place of a file of 1 GiB, whose cost must not depend on the samples, and safe edits, whose cost must not
 // depend on what else is in the folder.
+#include "Timing.h"
 #include "audiofile/CAudioFileIO.h"
 #include "audiofile/CContainerEdit.h"
 #include "audiofile/ContainerChanges.h"
@@ -81,28 +82,6 @@ private:
     int descriptor_ = -1;
     std::filesystem::path path_;
 };
-
-double processorTime()
-{
-    timespec now = {};
-    clock_gettime(CLOCK_THREAD_CPUTIME_ID, &now);
-    return static_cast<double>(now.tv_sec) + 1e-9 * static_cast<double>(now.tv_nsec);
-}
-
-template <class Work>
-double seconds(Work work)
-{
-    const auto start = std::chrono::steady_clock::now();
-    work();
-    return std::chrono::duration<double>(std::chrono::steady_clock::now() - start).count();
-}
-
-double median(std::vector<double> times)
-{
-    const auto middle = times.begin() + static_cast<std::ptrdiff_t>(times.size() / 2);
-    std::nth_element(times.begin(), middle, times.end());
-    return *middle;
-}
 
 /// 1 KiB put behind the samples of files that were just opened and last changed a while ago, beside the calls that
 /// cannot be left out (is it still the file that was opened, the chunk, the container's size), and beside a single
@@ -237,12 +216,12 @@ void SafeEditInFolder(benchmark::State& state)
     std::vector<double> ours[2], bare[2], processor[2];
     for (auto _ : state) {
         for (const int i : {0, 1}) {
-            const double before = processorTime();
+            const double before = secondsOn(CLOCK_THREAD_CPUTIME_ID);
             ours[i].push_back(seconds([&] {
                 if (!folders[i].editSafely())
                     state.SkipWithError("the edit failed");
             }));
-            processor[i].push_back(processorTime() - before);
+            processor[i].push_back(secondsOn(CLOCK_THREAD_CPUTIME_ID) - before);
             bare[i].push_back(seconds([&] {
                 if (!folders[i].replaceBare())
                     state.SkipWithError("the bare calls failed");

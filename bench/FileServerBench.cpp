@@ -1,6 +1,7 @@
 // The registry of shared samples: a thousand files of one second, beside libsndfile reading them as floats, and what a
 // further client of a registered file costs.
 #include "LoopFiles.h"
+#include "Timing.h"
 #include "audiofile/CAudioFileIO.h"
 #include "files/registry/CFileServer.h"
 
@@ -75,10 +76,6 @@ void RegisterFiles(benchmark::State& state)
         ours.push_back(cpuSeconds() - start);
         state.SetIterationTime(ours.back());
     }
-    const auto median = [](std::vector<double>& values) {
-        std::ranges::nth_element(values, values.begin() + std::ssize(values) / 2);
-        return values[values.size() / 2];
-    };
     state.counters["sndfile_ms"] = 1e3 * median(sndfile);
     state.counters["ms"] = 1e3 * median(ours);
     state.counters["times_as_fast"] = median(sndfile) / median(ours); // at least 1.5

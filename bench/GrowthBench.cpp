@@ -1,5 +1,6 @@
 // How cost grows with the length of a recording and with the number of its chunks: processor time, and where it matters
 // memory, at sizes ten times apart, and the exponent that fits them (1 is linear).
+#include "Timing.h"
 #include "audiofile/CAudioFileIO.h"
 #include "audiofile/ContainerChanges.h"
 #include "loops/overview/OverviewBlock.h"
@@ -26,19 +27,6 @@
 #include <vector>
 
 namespace {
-
-template <class Work>
-double processorSeconds(Work work)
-{
-    const auto now = [] {
-        timespec time{};
-        clock_gettime(CLOCK_PROCESS_CPUTIME_ID, &time);
-        return static_cast<double>(time.tv_sec) + 1e-9 * static_cast<double>(time.tv_nsec);
-    };
-    const double start = now();
-    work();
-    return now() - start;
-}
 
 /// The slope of a straight line through the logarithms.
 double exponentOf(const std::vector<std::pair<double, double>>& points)

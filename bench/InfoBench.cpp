@@ -1,6 +1,7 @@
 // What files are, beside others that tell it: `ktfiles info --json` over 400 mixed files as a process, beside exiftool
 // and mediainfo; and describing one compressed file, beside what FFmpeg takes to open it and to find its streams.
 #include "LoopFiles.h"
+#include "Timing.h"
 #include "audiofile/AudioFileInfo.h"
 #include "files/CFileIO.h"
 
@@ -27,12 +28,6 @@ double milliseconds(const auto& work)
     const auto begin = std::chrono::steady_clock::now();
     work();
     return std::chrono::duration<double, std::milli>(std::chrono::steady_clock::now() - begin).count();
-}
-
-double medianOf(std::vector<double> values)
-{
-    std::ranges::nth_element(values, values.begin() + static_cast<std::ptrdiff_t>(values.size() / 2));
-    return values[values.size() / 2];
 }
 
 bool run(const fs::path& folder, const std::string& command)
@@ -118,9 +113,9 @@ void DescribeCompressed(benchmark::State& state)
         ours.push_back(milliseconds(describe));
         state.SetIterationTime(ours.back() / 1000);
     }
-    state.counters["ms"] = medianOf(ours);
-    state.counters["ffmpeg_ms"] = medianOf(theirs);
-    state.counters["times_ffmpeg"] = medianOf(ours) / medianOf(theirs); // at most 1.3
+    state.counters["ms"] = median(ours);
+    state.counters["ffmpeg_ms"] = median(theirs);
+    state.counters["times_ffmpeg"] = median(ours) / median(theirs); // at most 1.3
 }
 BENCHMARK(DescribeCompressed)
     ->DenseRange(0, std::size(kFormats) - 1)
@@ -165,9 +160,9 @@ void InfoCommand(benchmark::State& state)
         mediainfo.push_back(timed("mediainfo --Output=JSON *"));
         state.SetIterationTime(ours.back() / 1000);
     }
-    state.counters["ms"] = medianOf(ours);
-    state.counters["exiftool_times"] = medianOf(exiftool) / medianOf(ours);   // at least 10
-    state.counters["mediainfo_times"] = medianOf(mediainfo) / medianOf(ours); // at least 10
+    state.counters["ms"] = median(ours);
+    state.counters["exiftool_times"] = median(exiftool) / median(ours);   // at least 10
+    state.counters["mediainfo_times"] = median(mediainfo) / median(ours); // at least 10
 }
 BENCHMARK(InfoCommand)
     ->ArgName("kinds")

@@ -1,6 +1,7 @@
 // `ktfiles meta --jsonl` over 2,000 WAVE files as a process, beside `exiftool -j` on the same files, and beside
 // `ktfiles scan` of as many loops: processor time, in turns.
 #include "LoopFiles.h"
+#include "Timing.h"
 #include "audiofile/metadata/AcidChunk.h"
 #include "audiofile/metadata/AssociatedDataList.h"
 #include "audiofile/metadata/BroadcastExtension.h"
@@ -147,29 +148,13 @@ Bytes waveFile(int number)
     return file.take();
 }
 
-double childSeconds()
-{
-    rusage usage{};
-    getrusage(RUSAGE_CHILDREN, &usage);
-    const auto seconds = [](const timeval& time) {
-        return static_cast<double>(time.tv_sec) + static_cast<double>(time.tv_usec) * 1e-6;
-    };
-    return seconds(usage.ru_utime) + seconds(usage.ru_stime);
-}
-
 /// The processor time that a command takes on a folder.
 double secondsOf(benchmark::State& state, const char* command, const std::filesystem::path& folder)
 {
-    const double before = childSeconds();
+    const double before = processorSecondsOfChildren();
     if (std::system(fmt::format("{} '{}' > /dev/null", command, folder.string()).c_str()) != 0)
         state.SkipWithError(command);
-    return childSeconds() - before;
-}
-
-double medianOf(std::vector<double> values)
-{
-    std::ranges::nth_element(values, values.begin() + static_cast<std::ptrdiff_t>(values.size() / 2));
-    return values[values.size() / 2];
+    return processorSecondsOfChildren() - before;
 }
 
 void MetaCommand(benchmark::State& state)
@@ -188,11 +173,11 @@ void MetaCommand(benchmark::State& state)
         state.SetIterationTime(meta.back());
     }
     const double exiftool = secondsOf(state, "exiftool -q -q -j -r", waves.path());
-    state.counters["us_per_file"] = medianOf(meta) * 1e6 / kFiles;
-    state.counters["only_bext_us_per_file"] = medianOf(only) * 1e6 / kFiles;
-    state.counters["scan_us_per_file"] = medianOf(scan) * 1e6 / kFiles;
-    state.counters["times_scan"] = medianOf(meta) / medianOf(scan); // at most 2
-    state.counters["exiftool_times"] = exiftool / medianOf(meta);   // at least 20
+    state.counters["us_per_file"] = median(meta) * 1e6 / kFiles;
+    state.counters["only_bext_us_per_file"] = median(only) * 1e6 / kFiles;
+    state.counters["scan_us_per_file"] = median(scan) * 1e6 / kFiles;
+    state.counters["times_scan"] = median(meta) / median(scan); // at most 2
+    state.counters["exiftool_times"] = exiftool / median(meta); // at least 20
 }
 BENCHMARK(MetaCommand)->UseManualTime()->Iterations(9)->Unit(benchmark::kMillisecond);
 

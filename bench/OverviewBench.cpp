@@ -1,5 +1,6 @@
 // Waveform overviews: of whole files, beside what must be done anyway, which is reading their bytes; and of floats that
 // stream by, beside converting each before it is folded. Processor time throughout; files lie in the page cache.
+#include "Timing.h"
 #include "audiofile/CAudioFileIO.h"
 #include "loops/overview/MDOverview.h"
 
@@ -72,19 +73,6 @@ public:
 private:
     std::filesystem::path path_;
 };
-
-template <class Work>
-double processorSeconds(Work work)
-{
-    const auto now = [] {
-        timespec time{};
-        clock_gettime(CLOCK_PROCESS_CPUTIME_ID, &time);
-        return static_cast<double>(time.tv_sec) + 1e-9 * static_cast<double>(time.tv_nsec);
-    };
-    const double start = now();
-    work();
-    return now() - start;
-}
 
 void readBytes(const char* path)
 {

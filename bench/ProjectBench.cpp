@@ -1,4 +1,5 @@
 // What a project with many alternatives uses, and the property lists that say so.
+#include "Timing.h"
 #include "platform/PropertyList.h"
 #include "project/ProjectInformation.h"
 
@@ -69,14 +70,6 @@ private:
     std::filesystem::path folder_;
     std::vector<Bytes> lists_;
 };
-
-template <class Work>
-double seconds(Work work)
-{
-    const auto start = std::chrono::steady_clock::now();
-    work();
-    return std::chrono::duration<double>(std::chrono::steady_clock::now() - start).count();
-}
 
 /// Beside parsing the 50 lists, which are in memory, one after the other. 20 of 20: every alternative uses the same.
 void AllUsedFiles(benchmark::State& state)

@@ -6,6 +6,7 @@
 #include "audiofile/ContainerEditor.h"
 #include "audiofile/FileWindow.h"
 #include "files/CFileUtil.h"
+#include "media/containers/ContainerEnd.h"
 #include "media/decoding/ConvertingReader.h"
 #include "platform/SystemCalls.h"
 

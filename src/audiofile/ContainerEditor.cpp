@@ -1,6 +1,7 @@
 #include "audiofile/ContainerEditor.h"
 
 #include "audiofile/FileWindow.h"
+#include "media/containers/ContainerEnd.h"
 #include "platform/core/ByteOrder.h"
 
 #include <algorithm>

@@ -3,7 +3,7 @@
 #pragma once
 
 #include "audiofile/AudioFileInfo.h"
-#include "media/containers/ChunkWalk.h"
+#include "media/containers/ContainerHeaders.h"
 #include "platform/core/Bytes.h"
 
 #include <cstdint>
@@ -12,14 +12,7 @@
 
 class CFileIO;
 class FileWindow;
-
-/// Where a new chunk goes.
-struct ContainerEnd {
-    ContainerChkExtended header; // in host order
-    platform::WalkedChunk last;  // the chunk behind which it goes
-    std::int64_t insertion = 0;
-    std::int64_t dataSize = 0; // of the chunk "data"
-};
+struct ContainerEnd;
 
 /// Owns neither the file nor its description, which it keeps true where an edit moves the samples or changes the
 /// length.

@@ -11,6 +11,7 @@ import struct
 import subprocess
 import tempfile
 import termios
+import threading
 import unittest
 
 import schemas
@@ -107,22 +108,30 @@ class CommandTest(unittest.TestCase):
 
     def on_terminal(self, *arguments, columns=0, **environment):
         """What the command writes to a terminal, of a width that it tells unless that is 0, and its exit status."""
-        process, terminal = pty.fork()
+        terminal, ours = pty.openpty()
+        process = os.fork()
         if process == 0:
+            os.close(terminal)
+            os.login_tty(ours)
             os.chdir(self.folder)
             fcntl.ioctl(1, termios.TIOCSWINSZ, struct.pack("HHHH", 24, columns, 0, 0))
             os.execve(KTFILES, [KTFILES, *arguments], {**os.environ, "TERM": "xterm", **environment})
+        # Our side stays open until all is read: Linux may drop what was written just before a terminal's last close.
+        end, statuses = b"\0end\0", []
+
+        def wait():
+            statuses.append(os.waitstatus_to_exitcode(os.waitpid(process, 0)[1]))
+            os.write(ours, end)
+
+        waiting = threading.Thread(target=wait)
+        waiting.start()
         text = b""
-        while True:
-            try:
-                piece = os.read(terminal, 65536)
-            except OSError:  # EIO: the other side is gone
-                piece = b""
-            if not piece:
-                break
-            text += piece
+        while not text.endswith(end):
+            text += os.read(terminal, 65536)
+        waiting.join()
+        os.close(ours)
         os.close(terminal)
-        return text.decode(errors="replace").replace("\r\n", "\n"), os.waitstatus_to_exitcode(os.waitpid(process, 0)[1])
+        return text.removesuffix(end).decode(errors="replace").replace("\r\n", "\n"), statuses[0]
 
     def assert_no_litter(self, *names):
         self.assertEqual(sorted(os.listdir(self.folder)), sorted(names))

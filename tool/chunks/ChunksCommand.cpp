@@ -137,7 +137,7 @@ std::string listFile(const std::string& path, ChunkListWriter& writer, bool quie
         failForSound(path, status);
     if (!begun)
         writer.begin(extent);
-    const std::string error = status != kStatusOK ? "a chunk header cannot be read" : "";
+    std::string error = status != kStatusOK ? "a chunk header cannot be read" : "";
     writer.end(error);
     return error;
 }

@@ -16,10 +16,10 @@ std::string keyText(const LoopTags& tags)
 {
     const std::int64_t note = tags.number(VireoLoopCombinedTagsChunkDataMidiRootNoteKey);
     const std::int64_t type = tags.number(VireoLoopCombinedTagsChunkDataKeyType);
-    const std::string mode = type == 0   ? ""
-                             : type == 3 ? "neither major nor minor"
-                             : type == 4 ? "major and minor"
-                                         : modeName(type);
+    std::string mode = type == 0   ? ""
+                       : type == 3 ? "neither major nor minor"
+                       : type == 4 ? "major and minor"
+                                   : modeName(type);
     if (note == 0)
         return mode;
     return noteName(note) + (mode.empty() ? "" : " " + mode);

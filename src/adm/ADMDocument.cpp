@@ -123,7 +123,9 @@ void ADMDocument::expectADMElementRef(std::string_view identifier, std::string_v
 /// Finds for one element after the other; knows which, so that a problem can be told with its place.
 class ADMDocument::LinkFinder : public ADMElementResolver {
 public:
-    explicit LinkFinder(ADMDocument& document) : document_(document) {}
+    explicit LinkFinder(ADMDocument& document) : document_(document), findsClasses_(document.findsClassesOfPrefixes())
+    {
+    }
     void setElement(const ADMElement& element) { element_ = &element; }
 
     ADMElement* findADMElementRef(std::optional<std::string_view> identifier,
@@ -146,10 +148,11 @@ public:
         document_.expectADMElementRef(identifier, typePrefix);
     }
 
-    bool findsClassesOfPrefixes() const override { return true; }
+    bool findsClassesOfPrefixes() const override { return findsClasses_; }
 
 private:
     ADMDocument& document_;
+    bool findsClasses_;
     const ADMElement* element_ = nullptr;
 };
 

@@ -21,6 +21,7 @@
 #include <optional>
 #include <span>
 #include <string_view>
+#include <typeinfo>
 #include <vector>
 
 class KT_EXPORT ADMDocument : private platform::XMLHandler, public ADMElementResolver {
@@ -73,8 +74,8 @@ public:
     ADMElement* findADMElementRef(std::optional<std::string_view> identifier,
                                   std::optional<std::string_view> typePrefix = {}) override;
     void expectADMElementRef(std::string_view identifier, std::string_view typePrefix) override;
-    /// A derived class whose look-up gives others must say so.
-    bool findsClassesOfPrefixes() const override { return true; }
+    /// Of this class itself; what the look-up of a derived one gives is not known.
+    bool findsClassesOfPrefixes() const override { return typeid(*this) == typeid(ADMDocument); }
 
     platform::InputStream* inputStream() const { return inputStream_.get(); }
     /// Null unless a parse runs.

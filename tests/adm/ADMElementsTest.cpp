@@ -138,7 +138,6 @@ TEST(ADMElementTable, ManyIDsOfAnyLength)
     EXPECT_EQ(table.find(std::string(100, 'x')), nullptr);
 }
 
-/// A different one for each number, all of the same hash: the standard library's function run backwards.
 /// Finds nothing, and knows what it was told ahead and what it was asked.
 struct Listener : ADMElementResolver {
     ADMElement* findADMElementRef(std::optional<std::string_view> id, std::optional<std::string_view> prefix) override
@@ -175,6 +174,30 @@ TEST(ADMElements, EveryReferenceIsAnnouncedOnceAndAskedForInOrder)
     EXPECT_EQ(object.audioTrackUIDs().size(), ids.size());
 }
 
+/// Finds the same element whatever is looked for.
+struct Misleading : ADMDocument {
+    Misleading() : ADMDocument(nullptr) {}
+    ADMElement* findADMElementRef(std::optional<std::string_view>, std::optional<std::string_view>) override
+    {
+        return &found;
+    }
+    ADMAudioContent found{{{"audioContentID", "ACO_1001"}, {"audioContentName", "C"}}};
+};
+
+TEST(ADMElements, WhatADerivedDocumentFindsIsTakenForNoOtherClass)
+{
+    Misleading document;
+    auto made = std::make_unique<ADMAudioObject>(
+        platform::XMLAttributes{{"audioObjectID", "AO_1001"}, {"audioObjectName", "O"}});
+    const ADMAudioObject& object = *made;
+    made->setAudioPackFormatIDRefs({"AP_00031001"});
+    document.addAudioObject(std::move(made));
+    document.resolveIDRefs();
+    ASSERT_EQ(object.audioPackFormats().size(), 1u);
+    EXPECT_EQ(object.audioPackFormats()[0], nullptr);
+}
+
+/// A different one for each number, all of the same hash: the standard library's function run backwards.
 std::string collidingID(std::uint64_t number)
 {
     const auto text = [](std::uint64_t word) { return std::string(reinterpret_cast<const char*>(&word), sizeof word); };

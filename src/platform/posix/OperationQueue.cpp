@@ -6,6 +6,7 @@
 #include <chrono>
 #include <deque>
 #include <mutex>
+#include <new>
 #include <system_error>
 #include <thread>
 #include <utility>
@@ -98,17 +99,30 @@ private:
         return started;
     }
 
+    /// False where there is no memory for it: then the thread ends.
+    bool park(std::shared_ptr<Parked>& mine)
+    {
+        try {
+            if (!mine)
+                mine = std::make_shared<Parked>();
+            const std::lock_guard lock(mutex_);
+            parked_.push_back(mine);
+            return true;
+        } catch (const std::bad_alloc&) {
+            return false;
+        }
+    }
+
     void serve(std::function<void()> work)
     {
-        const auto mine = std::make_shared<Parked>();
+        std::shared_ptr<Parked> mine;
         for (;;) {
             work();
             work = nullptr; // what it captured goes before the wait
-            std::unique_lock lock(mutex_);
-            parked_.push_back(mine);
-            lock.unlock();
+            if (!park(mine))
+                return;
             if (!mine->waitFor(kIdleTime)) {
-                lock.lock();
+                std::unique_lock lock(mutex_);
                 if (std::erase(parked_, mine) > 0)
                     return;
                 lock.unlock();

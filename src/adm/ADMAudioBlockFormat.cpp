@@ -22,7 +22,7 @@ std::string usualID(ADMType_t type, std::uint32_t index, std::uint32_t blockInde
     return text;
 }
 
-/// Whether `usualID` gives this ID back, which has been parsed.
+/// Whether `usualID` gives back this ID, which has been parsed already.
 bool isUsual(std::string_view identifier)
 {
     constexpr std::size_t size = std::string_view("AB_yyyyxxxx_zzzzzzzz").size();
@@ -87,7 +87,7 @@ void ADMAudioBlockFormat::setAudioBlockFormatID(std::string_view value)
     unusualID_ = std::make_unique<std::string>(value);
 }
 
-/// Before a number changes that the ID is made from.
+/// Stores the ID in force before one of the numbers that it is made from changes.
 void ADMAudioBlockFormat::keepID()
 {
     if (unusualID_ == nullptr)

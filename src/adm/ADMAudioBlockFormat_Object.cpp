@@ -46,7 +46,7 @@ void ADMAudioBlockFormat_Object::addSubElement_position(std::string_view value, 
         throw ADMException(kADMExceptionMalformedDefinition,
                            "cartesian audioBlockFormat position is missing coordinate attribute");
     if (attributes.find("bound"))
-        return; // how far a position may be moved is not modelled
+        return; // the distance that a position may be moved is not modelled
     const auto measure = [value](float& number, bool& isThere) {
         isThere = true;
         number = adm::floatOf(value);

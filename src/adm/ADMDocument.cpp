@@ -83,7 +83,7 @@ ADMElement* ADMDocument::findADMElementRef(std::optional<std::string_view> ident
                        "'" + std::string(*identifier) + "' referenced, but not defined");
 }
 
-/// What `work` gives for the table of the kind that has this prefix; null, or nothing, when there is none.
+/// The result of `work` on the table of the kind with this prefix; null, or nothing, when no kind has it.
 template <class Document, class Work>
 auto ADMDocument::withTableOf(Document& document, std::string_view prefix, Work work)
 {
@@ -120,7 +120,7 @@ void ADMDocument::expectADMElementRef(std::string_view identifier, std::string_v
     withTableOf(*this, typePrefix, [&](const auto& table) { table.prefetch(identifier); });
 }
 
-/// Finds for one element after the other; knows which, so that a problem can be told with its place.
+/// Resolves references for one element at a time and remembers which, so that a problem is reported with its place.
 class ADMDocument::LinkFinder : public ADMElementResolver {
 public:
     explicit LinkFinder(ADMDocument& document) : document_(document), findsClasses_(document.findsClassesOfPrefixes())

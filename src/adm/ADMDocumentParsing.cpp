@@ -1,4 +1,4 @@
-// The document as the receiver of its parser's events: elements are made, fed, and put away when they are complete.
+// The document as the receiver of its parser's events: elements are made, fed, and stored once they are complete.
 #include "adm/ADMDocument.h"
 #include "adm/ADMNames.h"
 #include "platform/core/Status.h"
@@ -6,7 +6,7 @@
 using platform::XMLAttributes;
 using platform::XMLPosition;
 
-/// What becomes of the elements of one name.
+/// How elements of one name are made and stored.
 struct ADMDocument::Kind {
     std::string_view name;
     std::string_view idAttribute;
@@ -24,7 +24,8 @@ struct ADMDocument::Kind {
                     document.push(std::move(element), attributes);
                 },
                 [](ADMDocument& document) {
-                    // Elements end in the order in which they stand within each other: it is of the kind that ends.
+                    // Elements end in the reverse order of their nesting, so the element on top is of the kind that
+                    // ends.
                     (document.*
                      add)(std::unique_ptr<Element>(static_cast<Element*>(document.popLastElement().release())));
                 }};

@@ -10,7 +10,7 @@ namespace {
 struct Form {
     std::string_view prefix;
     std::size_t digits;    // of the first field
-    std::size_t subDigits; // of the second one; 0: there is none
+    std::size_t subDigits; // of the second; 0 if there is none
     bool hasType;          // the first field is a type and an index, of four digits each
 };
 
@@ -38,7 +38,7 @@ constexpr std::array<std::uint8_t, 256> kDigits = [] {
     throw ADMException(kADMExceptionMalformedIDString, "unsupported prefix in ID " + std::string(identifier));
 }
 
-/// The number at `at`, which must have exactly so many digits; moves `at` behind it.
+/// Reads the number at `at`, which has exactly that many digits, and moves `at` past it.
 std::uint32_t readField(std::string_view identifier, std::size_t& at, std::size_t digits)
 {
     const std::size_t begin = at;
@@ -62,7 +62,7 @@ constexpr char upper(char c)
     return c >= 'a' && c <= 'z' ? static_cast<char>(c - 'a' + 'A') : c;
 }
 
-/// The form that the prefix of an ID has; moves `at` behind the "_".
+/// The form that belongs to the ID's prefix; moves `at` past the "_".
 const Form& formOf(std::string_view identifier, std::size_t& at)
 {
     std::uint32_t prefix = adm::kNoPrefix;
@@ -93,7 +93,7 @@ std::string_view adm::parseIdentifier(std::string_view identifier, ADMType_t* ty
         if (index != nullptr)
             *index = form.hasType ? field & 0xFFFF : field;
     } else if (form.subDigits != 0) {
-        at = std::min(identifier.find('_', at), identifier.size()); // behind a field that nobody asked for
+        at = std::min(identifier.find('_', at), identifier.size()); // skips a field that nobody asked for
     }
     if (form.subDigits != 0) {
         if (at == identifier.size() || identifier[at] != '_')

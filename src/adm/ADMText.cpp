@@ -14,7 +14,7 @@ bool isDigit(char c)
     return c >= '0' && c <= '9';
 }
 
-/// Takes a sign off; true for a minus.
+/// Removes a leading sign; true for a minus.
 bool takeSign(std::string_view& text)
 {
     const bool isMinus = text.starts_with('-');
@@ -23,7 +23,8 @@ bool takeSign(std::string_view& text)
     return isMinus;
 }
 
-/// A number that no `float` holds: by way of `double`, where that helps, else zero or infinity, as its exponent says.
+/// Zero or infinity for a number outside the range of `float`: by its value as a `double` if it has one, else by its
+/// exponent.
 float outOfRange(std::string_view text)
 {
     double wide = 0;
@@ -34,12 +35,12 @@ float outOfRange(std::string_view text)
     return isSmall ? 0 : std::numeric_limits<float>::infinity();
 }
 
-/// Numbers such as "-30.000000", without their sign: a quotient of two numbers that a `float` holds exactly is rounded
-/// once, and so is what the long way gives. False for others.
+/// Reads unsigned numbers such as "30.000000". The quotient of two numbers that a `float` holds exactly is rounded
+/// once, as the general conversion does. False if the text needs that one.
 bool readShortDecimal(std::string_view text, float& value)
 {
     static constexpr float powers[] = {1e0F, 1e1F, 1e2F, 1e3F, 1e4F, 1e5F, 1e6F, 1e7F, 1e8F, 1e9F, 1e10F};
-    constexpr std::size_t mostCharacters = 19; // whose digits fit 64 bits
+    constexpr std::size_t mostCharacters = 19; // the digits of so many characters fit 64 bits
     constexpr std::uint64_t largestExact = 1 << std::numeric_limits<float>::digits;
     if (text.size() > mostCharacters)
         return false;

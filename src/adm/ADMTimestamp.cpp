@@ -12,7 +12,7 @@ constexpr std::int64_t kSecond = 1000000;
 constexpr std::int64_t kMinute = 60 * kSecond;
 constexpr std::int64_t kHour = 60 * kMinute;
 constexpr std::size_t kMostDecimals = 38;   // 10^38 fits 128 bits
-constexpr std::int64_t kFractions = 100000; // in a second, when nothing else is said
+constexpr std::int64_t kFractions = 100000; // per second, unless the text says otherwise
 
 struct Timestamp {
     std::int64_t hours = 0, minutes = 0, seconds = 0, fraction = 0;
@@ -26,7 +26,7 @@ class Scanner {
 public:
     explicit Scanner(std::string_view text) : text_(text) {}
 
-    /// A signed integer that fits, blanks ahead of it.
+    /// Reads a signed 64-bit integer with optional blanks ahead of it.
     bool integer(std::int64_t& value)
     {
         text_ = adm::withoutLeadingBlanks(text_);
@@ -46,7 +46,7 @@ public:
             text_.remove_prefix(1);
         return found;
     }
-    /// Of the integer that was read last.
+    /// Digits of the integer that was read last.
     std::size_t digits() const { return digits_; }
 
 private:
@@ -76,13 +76,13 @@ std::int64_t microseconds(const Timestamp& time, Wide fractionsPerSecond)
     return narrow == sum ? narrow : kADMInvalidTime;
 }
 
-/// The form that nearly all documents have, "hh:mm:ss.zzzzz"; a negative number when it is not quite that.
+/// Reads "hh:mm:ss.zzzzz", the form of nearly all documents; negative if the text differs from it in any way.
 std::int64_t usualMicroseconds(std::string_view text)
 {
     constexpr std::string_view form = "00:00:00.00000";
     if (text.size() != form.size())
         return -1;
-    // What each digit counts; separators count nothing.
+    // Weight of each digit; separators weigh nothing.
     static constexpr std::int64_t worth[form.size()] = {
         10 * kHour, kHour, 0, 10 * kMinute, kMinute, 0, 10 * kSecond, kSecond, 0, 100000, 10000, 1000, 100, 10};
     std::int64_t time = 0;
@@ -113,7 +113,7 @@ std::int64_t ADMTimestampStringToExactMicroSeconds(std::optional<std::string_vie
     if (time.isSampleBased)
         return microseconds(time, time.fractionsPerSecond);
     Wide decimals = 1;
-    // So many digits that 10^n does not fit are zeros but for the last ones: nothing of a microsecond is left.
+    // Beyond 10^38 the leading digits of the fraction are zeros, so less than a microsecond remains.
     for (std::size_t i = 0; i < std::min(time.fractionDigits, kMostDecimals); ++i)
         decimals *= 10;
     return microseconds(time, decimals);
@@ -130,7 +130,7 @@ std::string ADMTimeMicrosecToTimestampString(std::int64_t microseconds)
     std::snprintf(fraction, sizeof fraction, "%05lld",
                   static_cast<long long>((belowMinute - seconds * kSecond + 5) / 10));
     char text[96];
-    // Kept: the fraction is cut to five characters, so that 99999.5 and more read as "10000".
+    // Kept: the fraction is cut to five characters, so 99999.5 and above read as "10000".
     std::snprintf(text, sizeof text, "%02lld:%02lld:%02lld.%.5s", static_cast<long long>(hours),
                   static_cast<long long>(minutes), static_cast<long long>(seconds), fraction);
     return text;

@@ -23,7 +23,7 @@ std::uint32_t fromLabel(std::optional<std::string_view> label)
 {
     std::uint32_t value = 0;
     if (label)
-        std::from_chars(label->data(), label->data() + label->size(), value, 16); // unreadable: 0 stays
+        std::from_chars(label->data(), label->data() + label->size(), value, 16); // stays 0 if the text cannot be read
     return value;
 }
 

@@ -34,7 +34,7 @@ std::int32_t CheckStatedDigest(CAudioFileIO& file, std::vector<platform::Contain
     }
     if (const std::int32_t status = file.Read(stated.data(), chunk.body, std::ssize(stated), nullptr);
         status != kStatusOK)
-        return status == kStatusEndOfFile ? kStatusOK : status; // that it is cut has been found
+        return status == kStatusEndOfFile ? kStatusOK : status; // the cut has been reported already
     platform::Digest digest(platform::Digest::Kind::md5);
     platform::Digest* const digests[] = {&digest};
     if (info.dataSize > 0)

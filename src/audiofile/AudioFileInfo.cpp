@@ -22,10 +22,10 @@ TAudioBusFormat busFormatOf(const platform::StoredFormat& format, std::int32_t c
     return format.speakers ? BusFormatOf(*format.speakers, channels) : AudioBusFormatForChannels(channels);
 }
 
-/// Channels, rate and coding; of linear PCM also how its samples stand, left-aligned in their bytes.
+/// Sets channels, rate and coding, and for linear PCM the layout of the samples, which are left-aligned in their bytes.
 void setStoredFormat(AudioFileInfo& info, const platform::StoredFormat& format)
 {
-    constexpr std::uint32_t mostChannels = 0xFFFF; // more than that is no sound but a damaged header
+    constexpr std::uint32_t mostChannels = 0xFFFF; // a header that claims more is damaged
     platform::StreamDescription stream = format.stream;
     if (stream.channelsPerFrame > mostChannels)
         stream.channelsPerFrame = stream.bytesPerFrame = 0;
@@ -51,7 +51,7 @@ void setStoredFormat(AudioFileInfo& info, const platform::StoredFormat& format)
     info.bytesPerFrame = static_cast<std::int32_t>(stream.bytesPerFrame);
 }
 
-/// The loop fields, behind all others.
+/// Sets the loop fields, which stand last.
 void setLoopTiming(AudioFileInfo& info, const std::optional<tagging::LoopTiming>& timing)
 {
     if (!timing)
@@ -64,7 +64,7 @@ void setLoopTiming(AudioFileInfo& info, const std::optional<tagging::LoopTiming>
         info.loopValue = static_cast<float>(beats * 60 * info.exactSampleRate / static_cast<double>(info.frames));
 }
 
-/// Of a chunk that is the basic tagging of a loop; none for any other.
+/// Reads the timing from a loop's basic tagging chunk; none for any other chunk.
 std::optional<tagging::LoopTiming> readLoopTiming(FileWindow& file, ContainerKind kind,
                                                   const platform::WalkedChunk& chunk)
 {
@@ -74,7 +74,7 @@ std::optional<tagging::LoopTiming> readLoopTiming(FileWindow& file, ContainerKin
         const bool there = size >= bytes.size() && file.get(bytes, chunk.body);
         return there ? tagging::LoopTimingInAIFF(bytes) : std::nullopt;
     }
-    constexpr std::uint64_t most = 1 << 20; // bytes of text that are looked at
+    constexpr std::uint64_t most = 1 << 20; // bytes of text that are searched
     tagging::UUIDBytes uuid;
     if (kind != ContainerKind::caf || chunk.id != kUuid || size < sizeof uuid || !file.get(uuid, chunk.body) ||
         cafChunkUUIDToChunkID(&uuid) != tagging::kBasicTagging)
@@ -85,7 +85,7 @@ std::optional<tagging::LoopTiming> readLoopTiming(FileWindow& file, ContainerKin
     return tagging::LoopTimingInCAF(payload);
 }
 
-/// What the packets of a CAF file hold that are there, where the library finds them.
+/// Counts the packets of a CAF file that are present, where the library can find them.
 void countPackets(const platform::URLRef& url, const platform::StoredFormat& format, AudioFileInfo& info)
 {
     platform::CompressedAudio packets;
@@ -100,7 +100,7 @@ void countPackets(const platform::URLRef& url, const platform::StoredFormat& for
     SetSoundFacts(info, packets.facts);
 }
 
-/// 0, or kStatusEndOfFile when what a file of the kind cannot do without is missing.
+/// kStatusEndOfFile if a part that files of the kind need is missing, else 0.
 std::int32_t describeContainer(FileWindow& file, platform::ChunkWalk& walk, const platform::URLRef& url,
                                AudioFileInfo& info)
 {
@@ -109,7 +109,8 @@ std::int32_t describeContainer(FileWindow& file, platform::ChunkWalk& walk, cons
     info.fileType = container.traits->fileType;
     info.containerId = container.traits->isEditable ? container.id : info.fileType;
     info.formType = container.formType;
-    if (kind == ContainerKind::rex2) { // what it holds below its first chunk is compressed in a way of its own
+    // A REX2 file holds compressed sound below its first chunk, in a coding of its own.
+    if (kind == ContainerKind::rex2) {
         info.containerId = kCAT;
         info.compressed = true;
         info.bitsPerSample = info.channels = 0;
@@ -158,7 +159,7 @@ std::int32_t describe(FileWindow& file, const platform::URLRef& url, AudioFileIn
 
 std::int32_t GetAudioFileInfo(CFileIO& file, unsigned int /*permission*/, AudioFileInfo& info)
 {
-    // no call where none is needed
+    // A file that is open for reading needs no call: its length at opening serves.
     FileWindow window(file, file.IsOpenForWriting() ? file.GetEOF() : file.LengthAtOpen());
     return DescribeAudioFile(window, file.IsMemoryFile() ? nullptr : file.URL(), info);
 }

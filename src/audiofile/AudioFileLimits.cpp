@@ -42,7 +42,7 @@ bool AudioFileDataNeedsSwap(unsigned int fileType, int bitsPerSample, unsigned i
         return false;
     if (isWAVE)
         return false;
-    // Kept: these two codes arrive with their bytes reversed, and are compared so.
+    // Kept: these two codes arrive with their bytes reversed and are compared that way.
     const bool reversedCode = formatCode == fourCC("mcpl") || formatCode == fourCC("23lf");
     return !(fileType == kCaff && reversedCode);
 }
@@ -55,13 +55,14 @@ float CalculateBeatCountForFile(const AudioFileInfo* info, int count, int)
         return 0;
     const std::int64_t rate = info->sampleRate;
     const std::int64_t frames = info->frames;
-    // What is shorter than 12/7 s, or longer than a minute, is taken for no loop. In 128 bits no rate overflows.
+    // A sound shorter than 12/7 s or longer than a minute is not taken for a loop. 128 bits keep any rate from
+    // overflowing.
     const __int128 wideRate = rate;
     if (frames < wideRate * 240 / 140 || frames > wideRate * 60)
         return 0;
     std::int64_t beats = std::int64_t{count} * 8;
     double tempo = static_cast<double>(beats) * 60.0 * static_cast<double>(rate) / static_cast<double>(frames);
-    if (!(tempo > 0)) // would never get faster
+    if (!(tempo > 0)) // else the loop below would never end
         return 0;
     for (; tempo < slowest; tempo *= 2)
         beats *= 2;

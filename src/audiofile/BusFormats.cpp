@@ -6,7 +6,7 @@
 
 namespace {
 
-// The speakers of the bus formats from 1 on.
+// The speakers of each bus format, from format 1 on.
 constexpr std::array<std::uint32_t, 14> kSpeakers{
     0x00004, // mono: C
     0x00003, // stereo: L R
@@ -56,7 +56,7 @@ TAudioBusFormat AudioBusFormatForChannels(int channels)
 
 std::uint32_t SpeakersOf(TAudioBusFormat busFormat, int channels)
 {
-    // Of several formats with as many channels none is guessed.
+    // Where several formats have the same number of channels, none is guessed.
     const TAudioBusFormat format = channels <= 2 ? AudioBusFormatForChannels(channels) : busFormat;
     return AudioBusFormatChannels(format) == channels && channels > 0 ? kSpeakers[static_cast<std::size_t>(format - 1)]
                                                                       : 0;

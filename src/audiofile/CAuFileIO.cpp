@@ -186,7 +186,7 @@ bool CAuFileIO::Swapped() const
                                            : (dataFormat_.formatFlags & StreamDescription::isBigEndian) != 0;
 }
 
-// Chunks, each the first item of user data with its id.
+// Chunks: each is the first item of user data with its id.
 
 int CAuFileIO::FindChunk(long id, CChunkData& chunk)
 {

@@ -1,4 +1,4 @@
-// The samples of CAuFileIO: in pieces, so that a file of any size costs the same memory.
+// The samples of CAuFileIO, converted piece by piece so that memory does not grow with the file.
 #include "audiofile/CAuFileIO.h"
 
 #include "media/samples/SampleConversion.h"
@@ -17,13 +17,13 @@ namespace {
 constexpr std::int32_t kNoWriteAccess = -54;
 constexpr std::int32_t kNoBitDepth = -1;
 
-constexpr std::int64_t kMaxPackets = std::numeric_limits<std::uint32_t>::max(); // and bytes, of one call
+constexpr std::int64_t kMaxPackets = std::numeric_limits<std::uint32_t>::max(); // and bytes, in one call
 
 using Piece = std::array<std::byte, 64 * 1024>;
 
 } // namespace
 
-/// Kept: 8-bit samples go by the container, not by what the format says of their sign.
+/// Kept: the container decides whether 8-bit samples are signed, not the format.
 platform::SampleFormat CAuFileIO::FileSamples() const
 {
     const int bits = static_cast<int>(std::min<std::int64_t>(BytesPerSample(), 16)) * 8;
@@ -40,7 +40,7 @@ bool CAuFileIO::HasPackedSamples() const
            BytesPerSample() * dataFormat_.channelsPerFrame == dataFormat_.bytesPerPacket;
 }
 
-/// By bytes, as a frame of many channels may be longer than a piece.
+/// Counts in bytes, because a frame of many channels may be longer than a piece.
 std::int32_t CAuFileIO::ReadSamples(float* dest, std::int64_t startFrame, std::int64_t& frames)
 {
     if (!file_)
@@ -66,7 +66,7 @@ std::int32_t CAuFileIO::ReadSamples(float* dest, std::int64_t startFrame, std::i
         if (const std::int32_t status = file_->readBytes(position + done * sampleSize, bytes, piece.data());
             status != kStatusOK)
             return status;
-        if (bytes != count * sampleSize) // another cut the file meanwhile
+        if (bytes != count * sampleSize) // another process cut the file meanwhile
             return kStatusEndOfFile;
         platform::samplesToFloat(piece.data(), format, dest + done, static_cast<std::size_t>(count));
         done += count;
@@ -122,7 +122,7 @@ std::int32_t CAuFileIO::WriteData(const void* data, long startFrame, long frames
         __builtin_mul_overflow(sampleSize * channels, startFrame, &start))
         return kStatusParameterError;
     constexpr bool hostIsBig = std::endian::native == std::endian::big;
-    if (Swapped() != hostIsBig) // the caller's samples stay swapped: callers of old count on it
+    if (Swapped() != hostIsBig) // the caller's samples stay swapped: old callers rely on it
         platform::swapSamples(const_cast<void*>(data), static_cast<int>(sampleSize),
                               static_cast<std::size_t>(frames) * channels);
     if (!file_)

@@ -1,4 +1,4 @@
-// CAudioFileIO: opening and closing, and the header that goes with the samples.
+// CAudioFileIO: opening and closing, and the header that describes the samples.
 #include "audiofile/CAudioFileIO.h"
 
 #include "audiofile/AudioFileHeader.h"
@@ -18,8 +18,8 @@
 
 namespace {
 
-/// Whether there is something that can be opened for writing. Opening it would tell as well, but creates what is
-/// missing.
+/// Whether the path leads to something that can be opened for writing. Opening it would answer too, but would create a
+/// missing file.
 bool isWritableTarget(const CFileRef& ref)
 {
     const char* path = ref.GetPath();
@@ -28,8 +28,8 @@ bool isWritableTarget(const CFileRef& ref)
            status.kind != platform::FileKind::directory;
 }
 
-/// A change within one tick of a file system's clock leaves the time of the one before. The coarsest ticks, those of
-/// FAT, are two seconds.
+/// Whether the file's timestamp is older than a tick of any file system's clock (two seconds on FAT). A change within
+/// one tick leaves the timestamp as it is, so a younger one proves nothing.
 bool wasLongAgo(const FileStamp& stamp)
 {
     const auto now = std::chrono::system_clock::now().time_since_epoch();
@@ -91,10 +91,10 @@ std::int32_t CAudioFileIO::OpenUndescribed(const CFileRef& ref, unsigned int per
     return CFileIO::Open(ref, permission);
 }
 
-/// A file that is no audio file is open all the same, and described as far as it was understood.
+/// A file that is no audio file is opened all the same, and described as far as it was understood.
 void CAudioFileIO::Describe(unsigned int permission)
 {
-    // Asked behind the stamp, ahead of all that is read: what changes from now on has another time.
+    // Read after the stamp and before any byte of the file, so that every later change gets another timestamp.
     const bool changesShow = (permission & kFileIOMemory) == 0 && IsOpenForWriting() && wasLongAgo(StampAtOpen());
     auto window = std::make_unique<FileWindow>(*this, IsOpenForWriting() ? GetEOF() : LengthAtOpen());
     infoStatus_ = DescribeAudioFile(*window, IsMemoryFile() ? nullptr : URL(), info_);
@@ -108,7 +108,8 @@ void CAudioFileIO::Describe(unsigned int permission)
     const bool singleFloats = info_.bitsPerSample == 32 && info_.floatingPoint;
     sampleFormat_ = singleFloats ? -32 : info_.bitsPerSample;
     if ((permission & kFileIOReadWrite) != 0 && info_.IsLinearPCM()) {
-        // A header with the reservation must be built with it again, or the samples would not stand behind it.
+        // A header that was built with the reservation is built with it again; otherwise the samples would not follow
+        // it.
         Header header;
         const auto length = [&](bool option) {
             return buildHeader(header, info_, info_.frames, sampleFormat_, option);
@@ -117,7 +118,7 @@ void CAudioFileIO::Describe(unsigned int permission)
     }
 }
 
-/// Where the headers lie in what was read already.
+/// Keeps the container's end, if the headers lie in the bytes that were read already.
 void CAudioFileIO::KeepEnd(FileWindow& window)
 {
     window.seal();
@@ -140,7 +141,7 @@ void CAudioFileIO::Init()
     CFileIO::Init();
 }
 
-/// All that is known of the file that was open.
+/// Resets everything that describes the file that was open.
 void CAudioFileIO::ForgetFile()
 {
     decoder_.reset();
@@ -185,12 +186,12 @@ std::int32_t CAudioFileIO::CreateAndOpenCommon(const CFileRef& ref, long cacheSi
     }
     Describe(kFileIOReadWrite);
     if (busFormat != kAudioBusUndefined && AudioBusFormatChannels(busFormat) == info_.channels)
-        info_.busFormat = busFormat; // the channel count alone does not tell
+        info_.busFormat = busFormat; // the channel count alone does not determine it
     headerOption_ = headerOption;
     return cacheSize > 0 ? SetCache(cacheSize * kibibyte) : kStatusOK;
 }
 
-/// The flag outlives a failure: what did not get into the file still has to.
+/// The flag stays set after a failure: the header still has to be written.
 std::int32_t CAudioFileIO::UpdateHeader()
 {
     if (!headerDirty_)
@@ -215,9 +216,9 @@ std::int32_t CAudioFileIO::UpdateHeader()
     return kStatusOK;
 }
 
-/// Whether the header on disk is one of ours, which may be built anew: then the option is the one that it was built
-/// with. Others hold what a new one would lose, or are shorter, so that it would go over the samples. One that was
-/// never filled in counts no frames.
+/// Whether the header on disk was built here, so that it can be built again; sets the option that it was built with. A
+/// foreign header holds fields that a new one would lose, or is shorter, so that a new one would overwrite samples. A
+/// header that was never filled in counts no frames.
 bool CAudioFileIO::HasBuiltHeader()
 {
     Header built;
@@ -227,7 +228,7 @@ bool CAudioFileIO::HasBuiltHeader()
             const long size = buildHeader(built, info_, frames, sampleFormat_, option);
             if (size <= 0 || size != info_.dataOffset || Read(stored.data(), 0, size, nullptr) != kStatusOK)
                 continue;
-            // Chunks behind the samples are counted in the container's size, and in the reservation for it.
+            // Chunks after the samples count in the container's size, and in the reservation's.
             if (info_.fileType != kCaff)
                 std::copy_n(stored.begin() + 4, 4, built.begin() + 4);
             if (info_.fileType == kWAVE && option)
@@ -245,7 +246,7 @@ std::int32_t CAudioFileIO::SetNumFrames(long frames)
 {
     if (const std::int32_t status = FlushWCache(); status != kStatusOK)
         return status;
-    // Building no header, or another one than that which is there, would lose what the file holds.
+    // Writing another header than the one that is there would lose what the file holds.
     if (!headerDirty_ && !HasBuiltHeader())
         return kStatusParameterError;
     Header header;
@@ -262,7 +263,7 @@ std::int32_t CAudioFileIO::SetNumFrames(long frames)
     info_.frames = frames;
     info_.dataSize = dataSize;
     info_.fileLength = length + dataSize;
-    headerDirty_ = (dataSize & 1) != 0; // Kept: the file is as long as its samples until UpdateHeader pads it
+    headerDirty_ = (dataSize & 1) != 0; // Kept: the file ends with its samples until UpdateHeader pads it
     return kStatusOK;
 }
 

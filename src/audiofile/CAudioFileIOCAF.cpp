@@ -13,7 +13,7 @@ constexpr std::size_t kUUIDSize = 16;
 using UUIDBytes = std::array<unsigned char, kUUIDSize>;
 
 /// Calls `visit(UUIDBytes& uuid, void* data, unsigned int size, std::uint32_t index)` for each item until it returns
-/// false. Items that cannot be read, or are shorter than a UUID, are passed over.
+/// false. Skips items that cannot be read or are shorter than a UUID.
 template <class Visit>
 void forEachItem(platform::AudioFile& file, Visit&& visit)
 {
@@ -83,8 +83,8 @@ std::int32_t CAudioFileIO::FindCAFChunkInUUIDChunk(platform::AudioFile& file, co
 
 std::int32_t CAudioFileIO::RemoveCAFChunkFromUUIDChunk(platform::AudioFile& file, const unsigned char* uuid)
 {
-    // Kept: the item that moves up into the place of a removed one is not looked at, so that the second of two adjacent
-    // duplicates survives.
+    // Kept: the item that moves into the place of a removed one is not examined, so of two adjacent duplicates the
+    // second survives.
     forEachItem(file, [&](UUIDBytes& itemUUID, void*, unsigned int, std::uint32_t index) {
         return !matches(uuid, itemUUID.data()) || file.removeUserData(kUuid, index) == kStatusOK;
     });

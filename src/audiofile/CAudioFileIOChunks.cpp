@@ -21,7 +21,7 @@ using platform::ChunkWalk;
 using platform::ContainerKind;
 using platform::WalkPolicy;
 
-/// Begins the walk: 0, -2 where there is no container, -3 for one whose header cannot be read.
+/// Begins the walk. 0, or -2 if the file is no container, or -3 if its header cannot be read.
 std::int32_t begin(ChunkWalk& walk)
 {
     if (walk.begin() == kStatusOK)
@@ -77,8 +77,8 @@ long long CAudioFileIO::NextChunkHeader(long long position, ChkHeader* current, 
     return result;
 }
 
-/// Of a file that is open for reading the window stays for all that is asked of it, until the file is another; one that
-/// is written to needs a new one each time, which the caller keeps.
+/// A file that is open for reading keeps one window until the file changes. A file that is open for writing needs a new
+/// window each time, which the caller holds in `own`.
 FileWindow& CAudioFileIO::Window(std::optional<FileWindow>& own)
 {
     if (!window_)
@@ -87,7 +87,7 @@ FileWindow& CAudioFileIO::Window(std::optional<FileWindow>& own)
     if (GetStamp(now) == kStatusOK && now != windowStamp_) {
         window_ = std::make_unique<FileWindow>(*this, now.length);
         windowStamp_ = now;
-        SetCache(CacheBlock()); // what it holds is of the file as it was
+        SetCache(CacheBlock()); // the cached bytes are those of the former file
     }
     return *window_;
 }
@@ -110,7 +110,7 @@ std::int32_t CAudioFileIO::ForEachChunk(const std::function<bool(const ChunkEntr
         const bool isOpen = traits.kind == ContainerKind::caf && chunk.size == -1 && chunk.id == traits.soundId;
         const auto body = static_cast<std::int64_t>(chunk.body);
         const std::int64_t size = isOpen ? window.fileLength() - body : chunk.size;
-        // Zeros are what some writers leave behind the last chunk; a walk gets no further there.
+        // Some writers leave zeros after the last chunk; a walk does not get past them.
         const bool isNone = chunk.id == 0 && size == 0;
         if (isNone || !visit({chunk.id, static_cast<std::int64_t>(chunk.position), size, body}))
             return kStatusOK;
@@ -118,8 +118,8 @@ std::int32_t CAudioFileIO::ForEachChunk(const std::function<bool(const ChunkEntr
     return walk.status();
 }
 
-/// The walk goes on behind a match, so that the last of several chunks is the one found; in CAF it is the first that is
-/// not empty. Only the last of a walk can lack bytes: the others were passed.
+/// The walk continues after a match, so the last of several chunks is found; in CAF the first that is not empty. Only
+/// the last chunk of a walk can lack bytes, because a walk does not pass one that does.
 std::int32_t CAudioFileIO::Locate(FourCC id, FoundChunk& found)
 {
     if (!IsOpen())
@@ -168,14 +168,14 @@ std::int32_t CAudioFileIO::LocateChunk(FourCC id, ChunkEntry& chunk)
 
 std::int32_t CAudioFileIO::ReadBytes(void* to, const FoundChunk& found)
 {
-    constexpr std::int64_t small = 512; // likely in the window with its header
+    constexpr std::int64_t small = 512; // the window probably holds such a body with its header
     if (window_ && found.size <= small &&
         window_->read(to, static_cast<std::uint64_t>(found.body), static_cast<std::size_t>(found.size)) == kStatusOK)
         return kStatusOK;
     return Read(to, found.body, static_cast<long>(found.size), nullptr);
 }
 
-/// 0, -5, or kStatusOutOfMemory. An empty body is a null array. What is not in the file is not allocated either.
+/// 0, -5, or kStatusOutOfMemory. An empty body is a null array. Memory is allocated only for bytes that the file holds.
 std::int32_t CAudioFileIO::ReadBody(const FoundChunk& found, std::unique_ptr<char[]>& data)
 {
     if (!found.HasItsBytes())

@@ -1,4 +1,4 @@
-// Sample access of CAudioFileIO to compressed data: by way of the converting reader, which opens the file for itself.
+// CAudioFileIO reads compressed data through a converting reader, which opens the file for itself.
 #include "audiofile/CAudioFileIO.h"
 
 #include "audiofile/ContainerDescriptions.h"

@@ -12,8 +12,8 @@ constexpr std::int64_t kCAFOpenEnd = -1;
 
 } // namespace
 
-/// What is still in the write cache belongs to the file; by a header that does not count the samples yet, a walk would
-/// end among them; and without a description nobody knows where the samples begin.
+/// Writes out the cached bytes and the header before a walk: a header that does not count the samples yet would end the
+/// walk among them. A file that could not be described is refused, because nobody knows where its samples begin.
 std::int32_t CAudioFileIO::PrepareToEdit()
 {
     if (readFailure_ != kStatusOK)
@@ -78,7 +78,7 @@ std::int32_t CAudioFileIO::PrepareToAppend()
     if (status != kStatusOK)
         return status;
     const bool lacksPad = tail.stray == -1 && (tail.last.size & 1) != 0;
-    if (tail.stray < 0 && !lacksPad) // a last chunk cut short: AddChunk gives it the size that it has
+    if (tail.stray < 0 && !lacksPad) // AddChunk gives a last chunk that was cut short its real size
         return kStatusOK;
     if (lacksPad) {
         const char pad = 0;
@@ -91,7 +91,7 @@ std::int32_t CAudioFileIO::PrepareToAppend()
     return status;
 }
 
-/// Gives a chunk "data" that goes to the end of the file the size that it has there.
+/// Gives a "data" chunk that extends to the end of the file the size that it has there.
 std::int32_t CAudioFileIO::SettleOpenEnd(const ChunkEntry& data)
 {
     const std::int64_t position = data.offset + std::int64_t{offsetof(CAFChunkHeader, size)};

@@ -1,4 +1,4 @@
-// Sample access of CAudioFileIO: in pieces, so that a file of any size costs the same memory.
+// Sample access of CAudioFileIO, piece by piece so that memory does not grow with the file.
 #include "audiofile/CAudioFileIO.h"
 
 #include "audiofile/AudioFileLimits.h"
@@ -16,7 +16,7 @@ std::size_t samplesInPiece(platform::SampleFormat format)
     return kPieceSize / static_cast<std::size_t>(format.bytesPerSample());
 }
 
-// Whether something other than a pad byte lies behind the sample data.
+// Whether the sample data is followed by anything but a pad byte.
 bool isFollowed(const CFileIO& file, const AudioFileInfo& info)
 {
     return file.GetEOF() > info.dataOffset + info.dataSize + (info.dataSize & 1);
@@ -84,14 +84,16 @@ std::int32_t CAudioFileIO::WriteFrames(const float* from, long long frame, long 
             done += next;
     }
     FramesWritten(frame + done / info_.channels);
-    if (status != kStatusOK && extends) { // what is left of a frame would pass for a chunk behind the samples
+    // The part of a frame that was written would look like a chunk after the samples.
+    if (status != kStatusOK && extends) {
         SetEOF(info_.dataOffset + info_.dataSize);
-        headerDirty_ = true; // the pad byte may be gone
+        headerDirty_ = true; // the pad byte may have been cut off
     }
     return status;
 }
 
-// Growing needs a header that can say so, room in the container, and nothing behind the samples that would be lost.
+// Growing needs a header that can state the new size, room in the container, and nothing after the samples that would
+// be lost.
 std::int32_t CAudioFileIO::PrepareToWrite(long long frame, long count)
 {
     const long long capacity = (MaxAudioFileSize(info_.fileType, true) - info_.dataOffset) / info_.bytesPerFrame;

@@ -40,7 +40,7 @@ std::int32_t CContainerEdit::LookAfter(int original, int edited)
     return difference_.Status();
 }
 
-/// Only where nothing stood behind the chunks before.
+/// Cuts off what a failed change left after the chunks, provided that nothing stood there before.
 void CContainerEdit::CutBack(int edited)
 {
     if (!before_ || before_->End() != before_->FileLength())
@@ -49,5 +49,5 @@ void CContainerEdit::CutBack(int edited)
     const platform::SystemCalls& calls = platform::systemCalls();
     if (!after.Take(edited, scope_, Bodies::digests) && after.End() < after.FileLength() &&
         calls.ftruncate(edited, after.End()) == 0)
-        calls.fsync(edited); // what failed before is told
+        calls.fsync(edited); // the failure of the change itself is what gets reported
 }

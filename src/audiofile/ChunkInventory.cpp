@@ -17,8 +17,8 @@ using Kind = ContainerProblem::Kind;
 namespace {
 
 constexpr std::int64_t kPiece = 1 << 20;
-constexpr std::int64_t kDigestEnd = 64 << 10;              // bytes of either end of a body
-constexpr std::int64_t kFirstChunk = sizeof(ContainerChk); // where a "ds64", or the room for it, stands
+constexpr std::int64_t kDigestEnd = 64 << 10;              // bytes at either end of a body
+constexpr std::int64_t kFirstChunk = sizeof(ContainerChk); // position of a "ds64" or of the room for it
 
 ContainerProblem readExactly(int descriptor, void* to, std::int64_t offset, std::int64_t count)
 {
@@ -42,7 +42,7 @@ class Pieces {
 public:
     Pieces(int descriptor, std::int64_t fileLength) : descriptor_(descriptor), fileLength_(fileLength) {}
 
-    /// At most `count` bytes from `offset` on, which are in the file; at least one, unless they cannot be read.
+    /// Up to `count` bytes from `offset`, all of which the file has; at least one unless they cannot be read.
     std::string_view at(std::int64_t offset, std::int64_t count)
     {
         if (offset < start_ || offset >= start_ + size_) {
@@ -82,7 +82,7 @@ bool areSame(Pieces& a, std::int64_t offsetInA, Pieces& b, std::int64_t offsetIn
     return true;
 }
 
-// What changes with the size of a container that may pass 4 GiB.
+// Fields that change with the size of a container that may pass 4 GiB.
 bool isRoomForSizes(const ContainerExtent& extent, const ChunkEntry& chunk)
 {
     return extent.id != kCaff && chunk.offset == kFirstChunk && (chunk.id == kDs64 || chunk.id == kJUNK);
@@ -132,13 +132,13 @@ ContainerProblem ChunkInventory::walk(const EditScope& scope)
     if (problem)
         return problem;
     fileLength_ = extent.fileLength;
-    // Less than a chunk header is no more than a pad byte that went astray.
+    // Fewer bytes than a chunk header are at most a stray pad byte.
     const auto headerSize = static_cast<std::int64_t>(extent.id == kCaff ? sizeof(CAFChunkHeader) : sizeof(ChkHeader));
     if (isUnfinished_ || fileLength_ - end_ < headerSize)
         return {};
     ContainerTail tail;
     if (ExamineContainerTail(file, tail) != kStatusOK || tail.fault != ContainerTail::Fault::none)
-        entries_.push_back({0, end_, fileLength_ - end_}); // not the room of an edit that was killed
+        entries_.push_back({0, end_, fileLength_ - end_}); // bytes that are not the room of an edit that was killed
     return {};
 }
 

@@ -6,7 +6,7 @@
 
 namespace {
 
-// Whether it makes up the sound, or the way to it. A container has one of each.
+// Whether the chunk holds the sound or is needed to find it. A container has one of each such chunk.
 bool isStructural(const ContainerExtent& extent, FourCC id)
 {
     return platform::roleOfChunk(extent.kind, id) == platform::ChunkRole::essential;
@@ -23,7 +23,7 @@ ContainerProblem SurveyChunks(CAudioFileIO& file, FourCC id, ChunkSurvey& survey
             return true;
         ++survey.count;
         survey.total += std::max<std::int64_t>(chunk.size, 0);
-        // An empty chunk of a CAF file is found only when there is no other.
+        // In a CAF file an empty chunk is found only if there is no other.
         if (survey.extent.id != kCaff || !survey.found || survey.found->size == 0)
             survey.found = chunk;
         return true;

@@ -16,7 +16,7 @@ constexpr std::int32_t kNoChunk = -1;
 constexpr unsigned char kWriting = 0;
 constexpr unsigned char kReading = 1;
 
-/// The file beside `file`; an invalid reference when that is `file` itself, which must not pass for its own sidecar.
+/// The sidecar beside `file`; invalid if that would be `file` itself, which must not pass for its own sidecar.
 CFileRef sidecarOf(const CFileRef& file, const char* extension)
 {
     CFileRef sidecar = file;
@@ -24,7 +24,7 @@ CFileRef sidecarOf(const CFileRef& file, const char* extension)
     return sidecar == file ? CFileRef::None : sidecar;
 }
 
-/// None without an extension, and none when it would be the metadata sidecar, with all the chunks that are in there.
+/// Invalid without an extension, and if the name is that of the metadata sidecar, which holds all other chunks.
 CFileRef rawSidecarOf(const CFileRef& file, const char* extension)
 {
     if (extension == nullptr)
@@ -33,7 +33,7 @@ CFileRef rawSidecarOf(const CFileRef& file, const char* extension)
     return sidecar == sidecarOf(file, kMetadataExtension) ? CFileRef::None : sidecar;
 }
 
-/// What a creation left that was interrupted: the start of a container, shorter than its headers.
+/// Whether the sidecar is what an interrupted creation leaves: the start of a container, shorter than its headers.
 bool isUnfinished(const CFileRef& sidecar)
 {
     CFileIO file;
@@ -53,13 +53,13 @@ bool isTaggedLoop(const AudioFileInfo& info)
     return info.loopCount >= 1 && info.loopValue > 0;
 }
 
-/// Kept: only the answer that this is no container counts as a failure.
+/// Kept: only "no container" counts as a failure.
 std::int32_t statusOfAdding(std::int32_t added, std::int32_t otherwise)
 {
     return added == 0 ? kStatusIOError : otherwise;
 }
 
-/// Kept: the status is that of the creation alone.
+/// Kept: the status is that of creating the file alone.
 std::int32_t writeRawSidecar(const CFileRef& sidecar, const char* data, long size)
 {
     const std::int32_t created = CFileUtilCreate(sidecar, 0, 0, 0644);
@@ -77,7 +77,7 @@ std::int32_t openMetadataSidecar(CAudioFileIO& out, const CFileRef& sidecar)
     return out.CreateAndOpenCommon(sidecar, cacheSize, kAudioBusMono, 0, 16, 44100, kAIFF, true);
 }
 
-/// The whole content; false when there is none.
+/// Reads the whole content; false if there is none.
 bool readMetadataSidecar(const CFileRef& sidecar, CChunkData& chunk, ChunkTransform transform)
 {
     CFileIO in;
@@ -122,10 +122,10 @@ std::int32_t CFileUtilAddData(const CFileRef& file, const CChunkData& chunk, con
     const auto copy = std::make_unique<char[]>(static_cast<std::size_t>(size));
     std::copy_n(chunk.data.get(), size, copy.get());
     transform(copy.get(), size, kWriting);
-    if (target.IsOpen() && target.InfoStatus() == kStatusIOError) // what it is, nobody knows
+    if (target.IsOpen() && target.InfoStatus() == kStatusIOError) // nobody can tell what it is
         return kStatusIOError;
     if (target.TakesChunks()) {
-        target.PrepareToAppend(); // Kept: where that refuses, AddChunk does what it can
+        target.PrepareToAppend(); // Kept: if that refuses, AddChunk does what it can
         return statusOfAdding(target.AddChunk(chunk.id, copy.get(), size, true), kStatusOK);
     }
     target.Close();
@@ -135,7 +135,8 @@ std::int32_t CFileUtilAddData(const CFileRef& file, const CChunkData& chunk, con
     const std::int32_t opened = openMetadataSidecar(metadata, sidecarOf(file, kMetadataExtension));
     if (opened != kStatusOK)
         return opened;
-    if (!metadata.TakesChunks()) // AddChunk, which removes first, would fail in a way that is not reported
+    // AddChunk removes first, so it would fail in a way that is not reported.
+    if (!metadata.TakesChunks())
         return kStatusIOError;
     return statusOfAdding(metadata.AddChunk(chunk.id, copy.get(), size, true), raw);
 }
@@ -169,7 +170,7 @@ std::int32_t CFileUtilRemoveData(const CFileRef& file, const CChunkData& chunk, 
     CAudioFileIO first(file, kFileIOReadWrite);
     if (first.IsOpen())
         first.RemoveChunk(chunk.id);
-    // Kept: a second pass, which finds a second chunk in a CAF file and nothing in others.
+    // Kept: a second pass, which finds another chunk in a CAF file and none in other files.
     CAudioFileIO second(file, kFileIOReadWrite);
     if (second.TakesChunks())
         status = second.RemoveChunk(chunk.id);

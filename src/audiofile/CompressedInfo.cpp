@@ -9,7 +9,7 @@
 
 namespace {
 
-/// Of `info` the fields that all of these have in common.
+/// Sets the fields of `info` that all of these formats have in common.
 void setCompressed(AudioFileInfo& info, FourCC fileType, const platform::StreamDescription& format,
                    std::uint64_t frames)
 {
@@ -18,7 +18,8 @@ void setCompressed(AudioFileInfo& info, FourCC fileType, const platform::StreamD
     info.compressed = true;
     info.formatCode = format.formatId;
     info.bitsPerSample = 0;
-    const bool isLossy = format.bytesPerPacket > 0 && !format.isLinearPCM(); // whose bits are those of its codes
+    // Their bits are those of the codes, not of samples.
+    const bool isLossy = format.bytesPerPacket > 0 && !format.isLinearPCM();
     info.sourceBits = isLossy ? 0 : static_cast<std::int32_t>(std::min<std::uint32_t>(format.bitsPerChannel, 64));
     info.channels = static_cast<std::int32_t>(std::min<std::uint32_t>(format.channelsPerFrame, 0xFFFF));
     info.busFormat = AudioBusFormatForChannels(info.channels);

@@ -16,7 +16,7 @@ ContainerProblem survey(const CFileRef& container, FourCC id, ChunkSurvey& found
     return SurveyChunks(file, id, found);
 }
 
-// Puts right at the end of the container what can be; what cannot be, force overrules.
+// Repairs the container's end where that is possible; force overrules what cannot be repaired.
 ContainerProblem openToAppend(CAudioFileIO& file, const CFileRef& container, bool isForced)
 {
     if (ContainerProblem problem = OpenContainer(file, container, kFileIOReadWrite))
@@ -70,7 +70,8 @@ ContainerProblem AddChunkTo(const CFileRef& container, const NewChunk& chunk)
     ChunkSurvey before, after;
     if (ContainerProblem problem = openToAppend(file, container, chunk.isForced))
         return problem;
-    if (chunk.replaces) { // not left to AddChunk, which removes only the first of them from a CAF file
+    // Done here because AddChunk removes only the first of several from a CAF file.
+    if (chunk.replaces) {
         if (ContainerProblem problem = ContainerProblem::ofStatus(file.Close()))
             return problem;
         if (ContainerProblem problem = survey(container, chunk.id, before))

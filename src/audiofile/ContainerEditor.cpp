@@ -15,7 +15,7 @@ namespace {
 using platform::ChunkWalk;
 using platform::WalkPolicy;
 
-constexpr std::uint32_t kSizeElsewhere = 0xFFFFFFFF; // in the "ds64"
+constexpr std::uint32_t kSizeElsewhere = 0xFFFFFFFF; // the size stands in the "ds64"
 constexpr std::int64_t kLargestFORM = 0x7FFFFFFF;    // sizes are signed
 
 std::int64_t padOf(std::int64_t size)
@@ -23,7 +23,7 @@ std::int64_t padOf(std::int64_t size)
     return size & 1;
 }
 
-/// A read that failed comes ahead of what was made of its absence.
+/// A failed read takes precedence over what was concluded from the missing bytes.
 std::int32_t unlessUnreadable(const FileWindow& window, std::int32_t status)
 {
     return window.failure() != kStatusOK ? window.failure() : status;
@@ -36,8 +36,10 @@ std::int32_t ContainerEditor::append(FourCC id, BytesView body, const ContainerE
     return isCAF() ? appendToCAF(id, body) : appendToContainer(id, body, atOpen);
 }
 
-/// At the end of the file, without a pad byte. Kept: a last chunk "data" whose size says "to the end of the file" is
-/// not closed first, so that what is put behind it becomes part of it; callers who may meet one look before.
+/// Appends at the end of the file, without a pad byte: header and body in one write if they are small, otherwise the
+/// header first. A body that was cut short is a chunk that runs past the end of the file. Kept: a last chunk "data"
+/// whose size means "to the end of the file" is not closed first, so the new chunk becomes part of it; callers who may
+/// meet one check before.
 std::int32_t ContainerEditor::appendToCAF(FourCC id, BytesView body)
 {
     long long end = 0;
@@ -49,8 +51,8 @@ std::int32_t ContainerEditor::appendToCAF(FourCC id, BytesView body)
     return writeTogether(end, pieces) == kStatusOK ? kAdded : kChunkHeaderFailed;
 }
 
-/// Kept: the container's size decides which chunk is the last, so that in a recording that was cut short, whose size is
-/// still 0, a new chunk goes over the samples; callers who may meet one look before.
+/// Kept: the container's size decides which chunk is the last, so in a recording that was cut short, whose size is
+/// still 0, a new chunk overwrites the samples; callers who may meet one check before.
 std::int32_t ContainerEditor::findEnd(FileWindow& window, ContainerEnd& end)
 {
     ChunkWalk walk(window, WalkPolicy::asStated);
@@ -70,7 +72,23 @@ std::int32_t ContainerEditor::findEnd(FileWindow& window, ContainerEnd& end)
     return walk.status() == kStatusOK ? kEndFound : walk.status();
 }
 
-/// Whether the sizes can be said is known before anything is written.
+/// Appends a chunk to RIFF and its kin or to FORM. All sizes are computed first, so a container that cannot state them
+/// is refused before anything is written. Then, each step with the bytes of the one before on their way to the file:
+///
+/// 1. Only if an RF64 file becomes RIFF: sizes that stood in the "ds64" go into the chunks' own headers. The header
+/// still says RF64, and a reader takes a size field that is not 0xFFFFFFFF as it stands: the chunks are the same.
+/// 2. Only if the size of the last chunk does not lead to the place of the new one: that size is corrected. The chunk
+/// ends where its bytes end; in RF64 a size in the "ds64" follows with step 4.
+/// 3. The new chunk, with its pad byte, goes behind the end that the container states. Readers that go by the
+/// container's size do not look there.
+/// 4. The container's header, in one write, counts the chunk; where sizes pass 4 GiB it is the same write that turns
+/// RIFF into RF64, and back.
+///
+/// A process that dies after 1 or 2 leaves the old chunks, which the next edit finds as if nothing had happened. After
+/// any part of 3 the container is the old one too, with bytes behind it that nobody counts; the next append finds the
+/// same end and overwrites them. A failed write leaves the file in the same states: nothing is rolled back. The steps
+/// are not flushed to the disk one by one, so a power failure may leave them in another order; edits that have to
+/// survive one work on a copy (CSafeEdit).
 std::int32_t ContainerEditor::appendToContainer(FourCC id, BytesView body, const ContainerEnd* atOpen)
 {
     FileStamp now;
@@ -110,7 +128,7 @@ std::int32_t ContainerEditor::appendToContainer(FourCC id, BytesView body, const
     return writeContainerHeader(header) == kStatusOK ? kAdded : kHeaderNotWritten;
 }
 
-/// Repairs a last chunk whose size is stale.
+/// Corrects the size of the last chunk if it does not lead to the place of the new one.
 std::int32_t ContainerEditor::storeLastSize(const ContainerEnd& end, ContainerChkExtended& header)
 {
     ChkHeader chunk{end.last.id, end.last.field};
@@ -123,7 +141,7 @@ std::int32_t ContainerEditor::storeLastSize(const ContainerEnd& end, ContainerCh
     return writeChunkHeader(static_cast<std::int64_t>(end.last.position), chunk, header);
 }
 
-/// Pieces that follow each other in the file, in one system call when they are small.
+/// Writes consecutive pieces, in one system call if they are small.
 std::int32_t ContainerEditor::writeTogether(std::int64_t position, std::span<const BytesView> pieces)
 {
     std::array<std::byte, 8192> together;
@@ -152,7 +170,7 @@ std::int32_t ContainerEditor::writeApart(std::int64_t position, std::span<const 
     return kStatusOK;
 }
 
-/// `chunk` is in file layout. Which part could not be written is found out by writing the header once more.
+/// `chunk` is in file layout. After a failure, writing the header once more tells which part did not fit.
 std::int32_t ContainerEditor::writeChunk(std::int64_t position, const ChkHeader& chunk, BytesView body, bool padded)
 {
     constexpr std::byte pad{};
@@ -177,7 +195,7 @@ std::int32_t ContainerEditor::writeContainerHeader(ContainerChkExtended header)
     return file_.Write(&header, 0, size);
 }
 
-/// A file that stops being 64-bit loses its "ds64": the chunks whose sizes stand there get them in their own headers.
+/// A file that stops being 64-bit loses its "ds64": chunks whose sizes stand there get them in their own headers.
 std::int32_t ContainerEditor::storeSizesOutright(const ContainerChkExtended& header)
 {
     FileWindow window(file_, file_.GetEOF());
@@ -194,8 +212,10 @@ std::int32_t ContainerEditor::storeSizesOutright(const ContainerChkExtended& hea
     return unlessUnreadable(window, status);
 }
 
-/// One pass finds all of them, the cuts are made together, and what stands ahead of the samples is renamed at last: the
-/// same bytes as finding and removing the last one again and again, in linear time.
+/// Finds all chunks in one pass, cuts those behind the samples' start together, and renames those ahead of it last. The
+/// bytes are the same as from finding and removing the last one repeatedly, in linear time.
+/// Nothing is rolled back, and a cut moves bytes in place: a process that dies in the middle leaves a file whose chunks
+/// no longer line up. Edits that have to survive that work on a copy (CSafeEdit).
 std::int32_t ContainerEditor::remove(FourCC id, OfCAF which)
 {
     long long length = 0;
@@ -217,7 +237,7 @@ std::int32_t ContainerEditor::remove(FourCC id, OfCAF which)
     std::vector<Extent> holes(firstCut, found.end());
     found.erase(firstCut, found.end());
     if (isCAF() && which == OfCAF::first && holes.size() > 1)
-        holes.resize(1); // Kept: hosts have one at a time cut out
+        holes.resize(1); // Kept: hosts remove one at a time
     std::int32_t status = holes.empty() ? kStatusOK : cutOut(holes);
     if (status == kStatusOK && !holes.empty() && !isCAF())
         status = shrink(header, holes);
@@ -226,8 +246,9 @@ std::int32_t ContainerEditor::remove(FourCC id, OfCAF which)
     return status;
 }
 
-/// In file order. A chunk that has not all of its bytes is not removed; of a container other than CAF, none is then.
-/// The status of a read that failed: behind an unreadable header the hole would seem to reach to the end of the file.
+/// The chunks in file order. A chunk that lacks some of its bytes is not removed; in a container other than CAF, none
+/// is removed then. Returns the status of a failed read: after an unreadable header the hole would seem to reach the
+/// end of the file.
 std::int32_t ContainerEditor::findAll(FileWindow& window, FourCC id, std::vector<Extent>& found) const
 {
     ChunkWalk walk(window, WalkPolicy::asStated);
@@ -247,7 +268,7 @@ std::int32_t ContainerEditor::findAll(FileWindow& window, FourCC id, std::vector
     return window.failure();
 }
 
-/// Closes the holes, which are in file order: what lies between them is moved down, at last the rest of the file.
+/// Closes the holes, which are in file order: moves down what lies between them, then the rest of the file.
 std::int32_t ContainerEditor::cutOut(const std::vector<Extent>& holes)
 {
     std::int64_t to = holes.front().position;
@@ -266,8 +287,8 @@ std::int32_t ContainerEditor::cutOut(const std::vector<Extent>& holes)
     return status;
 }
 
-/// Moves what lies between the first hole and the last towards the start of the file, to `to`, which goes behind it.
-/// What lies between many is moved together.
+/// Moves what lies between the first hole and the last down to `to`, and `to` past it. Small parts between many holes
+/// are moved together.
 std::int32_t ContainerEditor::closeUp(const std::vector<Extent>& holes, std::int64_t& to)
 {
     constexpr std::int64_t largestPiece = 1048576;
@@ -298,7 +319,7 @@ std::int32_t ContainerEditor::closeUp(const std::vector<Extent>& holes, std::int
     return kStatusOK;
 }
 
-/// Stores the container's size after a cut.
+/// Stores the container's size after the cuts.
 std::int32_t ContainerEditor::shrink(ContainerChkExtended header, const std::vector<Extent>& holes)
 {
     const ContainerChkExtended before = header;
@@ -306,8 +327,8 @@ std::int32_t ContainerEditor::shrink(ContainerChkExtended header, const std::vec
     for (const Extent& hole : holes)
         size -= hole.next - hole.position;
     if (holes.front().position == std::int64_t{sizeof(ContainerChk)})
-        header.firstChunkId = 0; // another stands there now, which must not be taken for a reservation
-    header.SetSize(size); // one that was too small all along becomes no size at all: what follows is not hidden by it
+        header.firstChunkId = 0; // the chunk that stands there now must not be taken for a reservation
+    header.SetSize(size); // a size that was too small all along becomes "no size", which hides nothing that follows
     if (before.HasValidDs64() && !header.HasValidDs64()) {
         if (const std::int32_t status = storeSizesOutright(before); status != kStatusOK)
             return status;
@@ -315,7 +336,7 @@ std::int32_t ContainerEditor::shrink(ContainerChkExtended header, const std::vec
     return writeContainerHeader(header);
 }
 
-/// Only the id is written, unless the size stands in the "ds64" under it.
+/// Writes only the id, unless the size stands in the "ds64" under it.
 std::int32_t ContainerEditor::renameToFree(std::int64_t position, const ContainerChkExtended& header)
 {
     ChkHeader chunk{kFree, {}};

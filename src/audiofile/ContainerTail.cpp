@@ -14,7 +14,7 @@ bool looksLikeAnId(FourCC id)
     return id != 0 && fourCCText(id).size() == sizeof id;
 }
 
-/// Behind a size that was never filled in, the samples stand.
+/// Whether samples follow a size that was never filled in.
 bool isOpenData(const ChunkEntry& chunk, bool isCAF)
 {
     constexpr std::int64_t editCountSize = 4, soundDataHeaderSize = 8;
@@ -35,18 +35,19 @@ ContainerTail::Fault faultOf(const ContainerTail& tail)
     const bool isCutShort = last.size > tail.extent.fileLength - last.body;
     if ((isCutShort || tail.stray > 0) && !isCAF && !looksLikeAnId(last.id))
         return Fault::noId;
-    if (isCutShort) // AddChunk puts that right, except in CAF
+    if (isCutShort) // AddChunk repairs that, except in CAF
         return isCAF ? Fault::cutShort : Fault::none;
     if (tail.stray >= headerSize || (tail.stray > 0 && isOpenData(last, isCAF)))
         return Fault::stray;
     return Fault::none;
 }
 
-/// What an edit in place leaves that is killed while it makes room behind the chunks: the header of filler, which no
-/// size counts yet, and zeros; in CAF, where the header counts at once, filler that is cut short.
+/// Whether the file ends as an in-place edit leaves it that is killed while it makes room after the chunks: with the
+/// header of a filler chunk that no size counts yet, and zeros; in CAF, where the header counts at once, with a filler
+/// chunk that is cut short.
 bool isUnfinishedRoom(CAudioFileIO& file, const ContainerTail& tail)
 {
-    constexpr std::int64_t most = 16 << 20; // more than an edit makes at a time
+    constexpr std::int64_t most = 16 << 20; // larger than the room that an edit makes
     if (tail.fault == ContainerTail::Fault::cutShort)
         return tail.last.id == kFree && tail.last.size >= 0;
     if (tail.extent.id == kCaff || tail.fault != ContainerTail::Fault::stray || isOpenData(tail.last, false))

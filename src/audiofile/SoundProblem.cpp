@@ -14,7 +14,7 @@ using Kind = ContainerProblem::Kind;
 
 namespace {
 
-/// How long the first header of a file is that begins so.
+/// A header that files of one kind begin with, and its length.
 struct KnownHeader {
     std::string_view start;
     std::uint64_t length;
@@ -31,7 +31,7 @@ bool endsInFirstHeader(FileWindow& window)
     return header != std::end(kKnownHeaders) && window.length() < header->length;
 }
 
-/// Of an MP4 file, in which a box says where the sound is.
+/// The problem of an MP4 file, in which a box says where the sound is.
 ContainerProblem problemOfMovie(FileWindow& window)
 {
     constexpr std::uint64_t toTheEnd = 0, inNext8 = 1;
@@ -59,7 +59,7 @@ ContainerProblem problemOfMovie(FileWindow& window)
     return {};
 }
 
-/// Of a container whose chunks do not tell what its sound is, or where.
+/// The problem of a container whose chunks do not tell what its sound is, or where.
 ContainerProblem problemOfChunks(CFileIO& file, bool hasChunks)
 {
     using Finding = platform::ContainerFinding;

@@ -42,7 +42,7 @@ AudioHandle* fileOf(void* handle)
     return platform::audioHandle(handle, AudioHandle::Kind::file);
 }
 
-/// Memory that is not to be had is a status for callers that know no exceptions.
+/// Turns a failed allocation into a status, for callers without exceptions.
 template <class Work>
 std::int32_t guarded(Work work)
 {
@@ -76,7 +76,7 @@ std::int32_t setClient(AudioHandle& reader, const XStreamDescription* format, co
                : status;
 }
 
-/// An MP3 file whose packet table counts no frame is refused; one that has no table is taken.
+/// Refuses an MP3 file whose packet table counts no frame; a file without a table is accepted.
 std::int32_t checkPackets(AudioHandle& reader)
 {
     StreamDescription format;
@@ -90,7 +90,7 @@ std::int32_t checkPackets(AudioHandle& reader)
     return isEmpty ? ConvertingReader::kInvalidDataFormat : kStatusOK;
 }
 
-/// What the file's format and the client's wishes let be opened.
+/// Checks whether the file's format and the client's wishes allow opening.
 std::int32_t prepare(AudioHandle& reader, std::uint32_t flags, const XStreamDescription* clientFormat,
                      const XStreamChannelLayout* clientLayout)
 {
@@ -261,7 +261,7 @@ std::int32_t XStreamWritePackets(XStreamRef, XStreamReadRequest*)
 std::int32_t XStreamGetPropertyInfo(XStreamRef stream, std::uint32_t id, std::uint32_t* outSize,
                                     std::uint32_t* outWritable)
 {
-    AudioHandle* file = fileOf(stream); // Kept: the stream's handle goes to the service of files
+    AudioHandle* file = fileOf(stream); // Kept: the stream's own handle is passed to the file service
     std::uint32_t size = 0;
     bool isWritable = false;
     const std::int32_t status = file != nullptr ? file->propertyInfo(id, size, isWritable) : kStatusParameterError;
@@ -300,7 +300,8 @@ std::int32_t XStreamSetProperty(XStreamRef stream, std::uint32_t id, std::uint32
         AudioHandle* file = nullptr;
         if (underlyingFileOf(*reader, file) != kStatusOK || file == nullptr)
             return kStatusParameterError;
-        file = fileOf(stream); // Kept: not the underlying file but the stream's own handle, which the service refuses
+        // Kept: not the underlying file but the stream's own handle, which the service refuses.
+        file = fileOf(stream);
         return file != nullptr ? file->setProperty(id, size, data) : kStatusParameterError;
     });
 }

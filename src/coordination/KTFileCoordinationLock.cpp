@@ -10,7 +10,8 @@ namespace {
 
 LockTable<KTFileCoordinationLock>& table()
 {
-    static auto& locks = *new LockTable<KTFileCoordinationLock>; // used by threads that may outlast static objects
+    // Never destroyed: threads may use it after static objects are gone.
+    static auto& locks = *new LockTable<KTFileCoordinationLock>;
     return locks;
 }
 
@@ -94,7 +95,7 @@ void KTFileCoordinationLock::acquire()
         fail(error.description);
 }
 
-/// Access stays open until the last holder has left, which may be before the handlers have returned.
+/// Access stays open until the last holder leaves, which may be before the handlers have returned.
 void KTFileCoordinationLock::hold(std::unique_ptr<platform::CoordinatedAccess> access)
 {
     {
@@ -123,7 +124,7 @@ void KTFileCoordinationLock::fail(const std::string& reason)
 
 void KTFileCoordinationLock::releaseLock()
 {
-    std::unique_ptr<platform::CoordinatedAccess> ended; // outside the mutex
+    std::unique_ptr<platform::CoordinatedAccess> ended; // destroyed outside the mutex
     const std::lock_guard guard(blockCreateLock_);
     if (holders_.release())
         ended = std::move(access_);

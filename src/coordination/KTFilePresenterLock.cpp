@@ -11,7 +11,8 @@ namespace {
 
 LockTable<KTFilePresenterLock>& table()
 {
-    static auto& locks = *new LockTable<KTFilePresenterLock>; // used by threads that may outlast static objects
+    // Never destroyed: threads may use it after static objects are gone.
+    static auto& locks = *new LockTable<KTFilePresenterLock>;
     return locks;
 }
 
@@ -32,13 +33,13 @@ platform::AskedBy askedBy(KTFilePresenterLock::LockType type)
 KTFilePresenterLock::KTFilePresenterLock(Creation, LockType type, platform::URLRef url)
     : item_(std::move(url)),
       lockType_(type),
-      fpQueue_(2) // a parked writer must not keep readers from being asked
+      fpQueue_(2) // a parked writer must not keep readers from asking
 {
 }
 
 KTFilePresenterLock::~KTFilePresenterLock()
 {
-    FileCoordinator::removeFilePresenter(*this); // while it can still be asked as what it is
+    FileCoordinator::removeFilePresenter(*this); // while others can still ask it as the lock that it is
 }
 
 std::shared_ptr<KTFilePresenterLock> KTFilePresenterLock::initLockWithType(LockType type, platform::URLRef url)
@@ -106,7 +107,7 @@ void KTFilePresenterLock::relinquishPresentedItemToWriter(platform::Reacquirer r
     relinquish(Party::writer, std::move(reacquirer));
 }
 
-/// While the lock is held the answer is kept for the release, and no thread waits for it.
+/// Keeps the answer for the release while the lock is held, so that no thread waits for it.
 void KTFilePresenterLock::relinquish(Party party, platform::Reacquirer reacquirer)
 {
     const LockType passes = party == Party::reader ? LockType::writersOnly : LockType::readersOnly;
@@ -157,7 +158,7 @@ void KTFilePresenterLock::acquire()
         fail(error.description);
 }
 
-/// Others see the lock from before it is acquired, so that none can begin in between and not ask.
+/// Makes the lock visible before it is acquired, so that nobody can begin in between without asking.
 bool KTFilePresenterLock::present(platform::Error* error)
 {
     const std::lock_guard guard(blockCreateLock_);
@@ -177,7 +178,7 @@ void KTFilePresenterLock::fail(const std::string& reason)
     platform::logLine("file lock: " + reason);
 }
 
-/// With the mutex held: the last holder has left.
+/// Called with the mutex held, once the last holder has left.
 void KTFilePresenterLock::becomeIdle()
 {
     FileCoordinator::setAskedBy(*this, platform::AskedBy::nobody);

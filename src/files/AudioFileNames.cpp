@@ -12,7 +12,7 @@ namespace {
 constexpr std::size_t kNameSize = 1024;
 constexpr std::size_t kShortNameSize = 256;
 
-/// The end of a name as one number, in lower case, its last character lowest: that it ends with a text is then one
+/// The last characters of a name as one number, in lower case, the last character lowest, so that "ends with" is one
 /// comparison.
 class Tail {
 public:
@@ -22,7 +22,7 @@ public:
             characters_ = characters_ << 8 | static_cast<unsigned char>(asciiLower(c));
     }
 
-    /// No name ends with an empty text.
+    /// False for an empty text.
     constexpr bool endsWith(const Tail& text) const
     {
         const std::uint64_t mask = (std::uint64_t{1} << 8 * text.length_) - 1;
@@ -72,7 +72,7 @@ StereoSuffix stereoSuffixOf(std::string_view name)
     return {};
 }
 
-/// The length of the first known extension or suffix that the name ends with, and is longer than; 0 for none.
+/// The length of the first known extension or suffix that the name ends with and is longer than; 0 if there is none.
 std::size_t knownExtensionLength(std::string_view name)
 {
     const Tail tail(name);
@@ -83,7 +83,7 @@ std::size_t knownExtensionLength(std::string_view name)
     return 0;
 }
 
-/// The name in a buffer of `size` bytes; at most one less, so that there is room for its NUL.
+/// The name in a buffer of `size` bytes; at most `size` - 1 characters, so that there is room for the NUL.
 std::string_view nameIn(char* name, int size)
 {
     const std::size_t capacity = static_cast<std::size_t>(size);
@@ -177,7 +177,7 @@ char* CFileUtilGetStereoExtension(char* out, int index)
         return nullptr;
     const AudioFileTypeRow& row = *CFileUtilAudioFileType(index / 2);
     const char* suffix = index % 2 == 0 ? row.leftSuffix : row.rightSuffix;
-    // Kept: the table's text is handed out as one that could be changed. It must not be.
+    // Kept: the table's text is returned as if it could be changed; the caller must not change it.
     return out != nullptr ? std::strcpy(out, suffix) : const_cast<char*>(suffix);
 }
 
@@ -212,7 +212,7 @@ bool CFileUtilCutKnownAudioFileExtension(CFileRef* file)
     if (file == nullptr || !file->IsValid())
         return false;
     char text[kNameSize];
-    // Kept: of a reference without a base the path is cut, so that a name which is only an extension goes too.
+    // Kept: a reference without a base has its whole path cut, so a name that is only an extension goes too.
     const bool isWhole = file->URL()->baseURL() == nullptr;
     const bool fits = isWhole ? file->GetPath(text, sizeof text) : file->GetFileName(text, sizeof text);
     return fits && CFileUtilCutKnownAudioFileExtension(text) && file->Set(text, false);

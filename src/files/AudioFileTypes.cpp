@@ -16,7 +16,7 @@ constexpr std::array<AudioFileTypeRow, kAudioFileTypeRows + 1> kTypes{{
     {fourCC("AIFF"), 5, ".aiff", "", "", "AIFF File"},
     {fourCC("WAVE"), 6, ".wav", ".L.wav", ".R.wav", "Wave File PC"},
     {fourCC("WAVE"), 4, ".wav", ".wal", ".war", "Wave File PC"},
-    // Kept: reached by their type only; as suffixes the rows above come first.
+    // Kept: this row is found by its type only; its suffixes are found in the rows above.
     {fourCC(".WAV"), 6, ".wav", ".L.wav", ".R.wav", "Wave File PC"},
     {fourCC(".WAV"), 4, ".wav", ".wal", ".war", "Wave File PC"},
     {fourCC("caff"), 6, ".caf", ".L.caf", ".R.caf", "CAF File"},
@@ -79,7 +79,7 @@ const AudioFileExtensionRow* CFileUtilAudioFileExtensions()
 
 unsigned int CFileUtilFileTypeOfExtension(std::string_view extension)
 {
-    std::array<char, 4> lowered; // as long as the longest
+    std::array<char, 4> lowered; // the longest has four characters
     if (extension.size() > lowered.size())
         return 0;
     std::transform(extension.begin(), extension.end(), lowered.begin(), asciiLower);

@@ -50,8 +50,8 @@ std::int32_t CFileIO::Read(void* buffer, long long position, long count, long* a
     return status;
 }
 
-/// Reads until `enough` of `count` bytes are there; reading on to the end of a file that is known to be near would cost
-/// a call that delivers nothing.
+/// Reads until `enough` of `count` bytes have arrived. Reading on to a known end of the file would cost a call that
+/// returns nothing.
 std::int32_t CFileIO::ReadDirect(void* buffer, long long position, long count, long enough, long* actual) const
 {
     *actual = 0;
@@ -148,7 +148,7 @@ std::int32_t CFileIO::Write(const void* buffer, long count)
     return status;
 }
 
-/// To the file or memory block itself, past the write cache.
+/// Writes to the file or memory block itself, past the write cache.
 std::int32_t CFileIO::WriteThrough(const void* buffer, long long position, long count)
 {
     if (IsMemoryFile())
@@ -169,7 +169,7 @@ std::int32_t CFileIO::WriteThrough(const void* buffer, long long position, long 
     return kStatusOK;
 }
 
-/// Tells the system, once, that the bytes of a file so long will not be wanted again soon.
+/// Tells the system once that the bytes of a file this long will not be needed again soon.
 void CFileIO::HintAtNoReuse(long long length)
 {
     if (isHinted_ || length < kWorthAHint)
@@ -178,8 +178,8 @@ void CFileIO::HintAtNoReuse(long long length)
     platform::systemCalls().adviseNoReuse(descriptor_);
 }
 
-/// Kept: growing goes by way of SetEOF, so that a mark beyond the new end moves there, and nothing written beyond the
-/// end makes the file that long.
+/// Kept: a memory file grows through SetEOF, which moves a mark beyond the new end there; even an empty write beyond
+/// the end makes the file that long.
 std::int32_t CFileIO::WriteToMemory(const void* buffer, long long position, long count)
 {
     if (position < 0)
@@ -246,7 +246,7 @@ std::int32_t CFileIO::SetEOF(long long length)
         if (status != kStatusOK)
             return status;
     } else {
-        cacheLength_ = 0; // it may hold bytes that are cut off
+        cacheLength_ = 0; // the cache may hold bytes that are cut off
         HintAtNoReuse(length);
         while (platform::systemCalls().ftruncate(descriptor_, length) != 0) {
             if (errno != EINTR)
@@ -275,7 +275,8 @@ std::int32_t CFileIO::Allocate(long long length, bool preallocate)
     const bool isReserved = preallocate && !IsMemoryFile() && GetEOF(&end) == kStatusOK &&
                             platform::systemCalls().preallocate(descriptor_, end, length) == 0;
     const std::int32_t status = SetEOF(length);
-    // As much as the file held before is reserved beyond its new end; to be set to the length it has gives that back.
+    // Preallocating reserves `length` bytes beyond the former end; setting the length once more gives back what lies
+    // beyond it.
     return status == kStatusOK && isReserved && end > 0 ? SetEOF(length) : status;
 }
 
@@ -287,7 +288,7 @@ std::uint32_t CFileIO::CRC()
     std::uint32_t crc = 0;
     for (long long left = GetEOF(); left > 0;) {
         const auto piece = static_cast<long>(std::min<long long>(pieceSize, left));
-        // Kept: from the mark on and not from the start, which is for the caller to set.
+        // Kept: reads from the mark, not from the start; the caller sets the mark.
         if (Read(buffer.data(), piece) != kStatusOK)
             return noCRC;
         crc = ECCRC32(crc, buffer.data(), static_cast<std::size_t>(piece));

@@ -1,13 +1,13 @@
-// The two caches of CFileIO: their sizes, what they hold, when they are emptied.
+// The two caches of CFileIO: their sizes, their content, when they are emptied.
 #include "files/CFileIO.h"
 
 #include <algorithm>
 #include <cstring>
 
-/// Copies what the cached range holds of a request, from its position on, and returns how much that was.
+/// Copies as much of the request as the cached range holds from its position, and returns the number of bytes.
 long CFileIO::CopyFromCache(void* buffer, long long position, long count) const
 {
-    // Another owner of the block may have made it smaller.
+    // Another owner of the block may have shrunk it.
     const long long held = std::min(cacheLength_, static_cast<long long>(cache_->size()));
     const long long skip = position - cacheOffset_;
     if (position < cacheOffset_ || skip >= held)
@@ -17,8 +17,9 @@ long CFileIO::CopyFromCache(void* buffer, long long position, long count) const
     return static_cast<long>(copied);
 }
 
-/// Fills the cache from a position; false, and the cache empty, when not even `needed` bytes came. A block that reaches
-/// beyond the end of the file holds what there is. A request that the block cannot hold leaves it as it is.
+/// Fills the cache from a position. False, with the cache empty, if fewer than `needed` bytes arrive; a block that
+/// reaches beyond the end of the file holds what there is. False, with the cache unchanged, if the block cannot hold
+/// `needed` bytes.
 bool CFileIO::Refill(long long position, long needed)
 {
     const auto size = static_cast<long>(cache_->size());

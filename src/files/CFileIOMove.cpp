@@ -32,7 +32,7 @@ std::int32_t CFileIO::BlockMove(long long from, long long to)
     return to > from ? MoveUp(from, to - from, length) : MoveDown(from, from - to, length);
 }
 
-/// Backwards from the end, so that no byte is overwritten before it is read.
+/// Moves backwards from the end, so that no byte is overwritten before it is read.
 std::int32_t CFileIO::MoveUp(long long from, long long distance, long long length)
 {
     long long newLength = 0;
@@ -70,15 +70,16 @@ std::int32_t CFileIO::MoveDown(long long from, long long distance, long long len
     return status == kStatusOK ? SetEOF(length - distance) : status;
 }
 
-/// Asks for the space first: a disk that turned out to be full in the middle of a move would leave the file torn.
+/// Reserves the space first: a disk that fills up in the middle of a move would leave the file torn.
 std::int32_t CFileIO::ReserveBehind(long long end, long long size)
 {
     if (IsMemoryFile() || platform::systemCalls().preallocate(descriptor_, end, size) == 0)
         return kStatusOK;
-    return errno == ENOSPC || errno == EDQUOT ? PosixErrorToOSErr() : kStatusOK; // else: not every file system can
+    // Not every file system can preallocate.
+    return errno == ENOSPC || errno == EDQUOT ? PosixErrorToOSErr() : kStatusOK;
 }
 
-/// Past the read cache: what is moved is read once.
+/// Reads past the read cache, because moved bytes are read only once.
 std::int32_t CFileIO::ReadPiece(void* buffer, long long position, long count)
 {
     if (IsMemoryFile())

@@ -1,4 +1,4 @@
-// How CFileIO opens and closes.
+// How CFileIO opens and closes files.
 #include "files/CFileIO.h"
 
 #include "files/CFileUtil.h"
@@ -13,8 +13,8 @@ namespace {
 constexpr std::uint32_t kNewFilePermissions = 0644;
 constexpr std::int64_t kLargestAliasFile = 8192; // a bookmark holds a path and little more
 
-/// Whether an open file is to be resolved as an alias instead. Its length answers for nearly every audio file, so that
-/// opening one costs no read.
+/// Whether an open file should be resolved as an alias instead. The length alone rules that out for nearly every audio
+/// file, so that opening one costs no read.
 bool IsAliasFile(int descriptor, const platform::FileStatus& status)
 {
     if (status.size == 0 || status.size > kLargestAliasFile)
@@ -24,7 +24,7 @@ bool IsAliasFile(int descriptor, const platform::FileStatus& status)
     return got > 0 && platform::looksLikeBookmark(BytesView(start).first(static_cast<std::size_t>(got)));
 }
 
-/// Whether "." or ".." is a component of the path: what it leads to has another path then.
+/// Whether "." or ".." is a component of the path, which then differs from the path of the item that it leads to.
 bool HasDots(std::string_view path)
 {
     for (std::size_t at = path.find("/."); at != path.npos; at = path.find("/.", at + 1)) {
@@ -87,8 +87,8 @@ std::int32_t CFileIO::Open(const CFileRef& ref, unsigned int mode)
     return status;
 }
 
-/// Opening a path without links or dots proves at once that there is nothing to resolve, that the file exists and that
-/// it is no folder. Whatever else comes of it is looked at step by step.
+/// Opening a path without links or dots proves in one call that there is nothing to resolve, that the file exists and
+/// that it is no folder. If that fails, the steps are taken one by one.
 std::int32_t CFileIO::OpenFile(const CFileRef& ref, unsigned int mode)
 {
     const platform::SystemCalls& system = platform::systemCalls();
@@ -150,7 +150,7 @@ std::int32_t CFileIO::Close()
     return flushed != kStatusOK ? flushed : closed;
 }
 
-/// Never tried again: after a failure, even an interruption, the descriptor is gone.
+/// Not retried after a failure: even after an interruption the descriptor is gone.
 std::int32_t CFileIO::CloseDescriptor()
 {
     std::int32_t status = kStatusOK;

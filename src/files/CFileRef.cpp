@@ -51,7 +51,7 @@ void CFileRef::ReInit()
     fileHandle_.reset();
 }
 
-// Setters take what they need before they reset: the argument may be this reference's own path, or its own URL.
+// Setters copy what they need before they reset, because the argument may be this reference's own path or URL.
 
 bool CFileRef::Set(const char* path, bool isDirectory)
 {
@@ -112,7 +112,7 @@ bool CFileRef::SetFromColonPath(const char* path, bool isDirectory)
     String text = platform::decodeCString(path, mLocalEncoding);
     if (text.isNull())
         text = platform::decodeCString(path, platform::systemTextEncoding());
-    if (text.isNull() && path != nullptr) // only a zero byte is sure to end it: to look for two would read past it
+    if (text.isNull() && path != nullptr) // one zero byte surely ends the text; looking for two would read past it
         text = platform::decodeText(path, platform::kTextEncodingUnicode16);
     return Set(platform::URL::createWithFileSystemPath(text, PathStyle::colon, isDirectory));
 }
@@ -122,7 +122,7 @@ bool CFileRef::SetFromURLString(const std::string& url)
     return Set(platform::URL::createWithString(url));
 }
 
-/// A POSIX path in which "~" and "~user" at the beginning stand for a home folder.
+/// Sets a POSIX path whose leading "~" or "~user" stands for a home folder.
 bool CFileRef::SetTildePath(const String& path, bool isDirectory)
 {
     const std::string& text = path.utf8();

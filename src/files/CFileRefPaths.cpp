@@ -1,4 +1,4 @@
-// The path of a reference, its name and extension, and paths built from it.
+// The path of a reference, its name and extension, and paths derived from it.
 #include "files/CFileRef.h"
 
 #include "platform/core/ASCIICase.h"
@@ -16,7 +16,8 @@ namespace {
 constexpr std::size_t kNameBufferSize = 1024;
 constexpr std::size_t kLongestComparedExtension = 19;
 
-/// The extension in a name, null when it has no dot: what follows the last one, also when nothing does, and also when
+/// The extension in a name: the text after the last dot, even if it is empty or the dot comes first; null if there is
+/// no dot.
 /// nothing comes before.
 const char* extensionIn(const char* name)
 {
@@ -36,7 +37,7 @@ std::string_view withoutLeadingDot(std::string_view extension)
 
 const char* CFileRef::GetPath() const
 {
-    // A URL with a base has a path, yet not one of its own; one of another host or scheme has none.
+    // A URL with a base has an absolute path, though not one of its own; one of another host or scheme has none.
     if (!valid_ || !url_->hasAbsolutePath() || url_->posixPath().empty())
         return nullptr;
     return url_->posixPath().c_str();
@@ -108,7 +109,7 @@ bool CFileRef::ReplaceName(const char* name, bool isDirectory)
 
 bool CFileRef::ReplaceName(const String& name, bool isDirectory)
 {
-    // Without a name the result would be the parent, passed off as the item.
+    // Without a name the result would be the parent instead of an item in it.
     if (name.isEmpty() || (!valid_ && isDirectory))
         return Set(URLRef());
     if (!valid_)
@@ -135,7 +136,7 @@ bool CFileRef::ReplaceExtensionBy(const std::string& ext)
         name.resize(dot);
     if (!replacement.empty())
         (name += '.') += replacement;
-    // A name that GetFileName cannot give has no extension either.
+    // A name too long for GetFileName has no extension either.
     return name.size() < kNameBufferSize ? ReplaceName(String::fromUTF8(name), false) : Set(URLRef());
 }
 
@@ -152,7 +153,7 @@ bool CFileRef::GetFileName(char* buffer, long size) const
     const String name = CopyFileName();
     if (!name.isNull() || !valid_)
         return name.getFileSystemRepresentation(buffer, static_cast<std::size_t>(size));
-    const std::string& path = url_->posixPath(); // of a URL that was made of bytes
+    const std::string& path = url_->posixPath(); // present if the URL was made from bytes
     const std::string_view bytes = std::string_view(path).substr(path.rfind('/') + 1);
     if (bytes.empty() || bytes.size() >= static_cast<std::size_t>(size))
         return false;

@@ -1,4 +1,4 @@
-// What the file system knows of a reference's item, and the comparison of references.
+// What the file system knows about a reference's item, and the comparison of references.
 #include "files/CFileRef.h"
 
 #include "files/CFileUtilLocations.h"
@@ -26,7 +26,8 @@ bool targetStatusOf(const CFileRef& ref, FileStatus& status)
     return path != nullptr && platform::systemCalls().pathStatus(path, &status);
 }
 
-/// What references are compared by; of a URL without a path, which the file system cannot resolve, its text.
+/// The text that references are compared by: the resolved path, or the URL's text if it has no path that the file
+/// system could resolve.
 String resolvedPath(const CFileRef& ref)
 {
     const String path = ref.CopyFileSystemPath(kPOSIXPathStyle);
@@ -61,7 +62,7 @@ CFileRef CFileRef::GetMountPoint() const
         return None;
     CFileRef folder = *this;
     while (!folder.IsRoot()) {
-        // The root has no parent to go on with, should its status not be had.
+        // The root has no parent, so the loop ends there even if the root's status cannot be read.
         if (std::string_view(folder.GetPath()) == "/" || !folder.SetToParent())
             return None;
     }
@@ -77,7 +78,7 @@ bool CFileRef::IsRoot() const
         return false;
     if (own.device == above.device)
         return own.inode == above.inode;
-    // The files of an overlay have other devices than their folders, on one mount.
+    // In an overlay, files have other device numbers than the folder that holds them, on the same mount.
     return own.kind == FileKind::directory || !CFileUtilItemsOnSameVolume(*this, parent);
 }
 
@@ -123,7 +124,7 @@ bool CFileRef::PathContains(const CFileRef& other) const
         return false;
     if (!equalIgnoringASCIICase(outer, inner.substr(0, outer.size())))
         return false;
-    // Kept: so the root contains no path but itself
+    // Kept: therefore the root contains no path but itself.
     return outer.size() == inner.size() || inner[outer.size()] == '/';
 }
 
@@ -133,7 +134,7 @@ bool CFileRef::ResolveAlias(bool allowUserInteraction)
         return false;
     if (const auto bookmark = platform::bookmarkOfAliasFile(*url_)) {
         const auto resolved = platform::resolveBookmark(*bookmark, {.withoutUserInterface = !allowUserInteraction});
-        // Kept: the target of a stale bookmark is not trusted
+        // Kept: the target of a stale bookmark is not trusted.
         const URLRef target = resolved.isStale ? nullptr : platform::filePathURL(resolved.url);
         if (target) {
             if (*target != *url_)
@@ -173,7 +174,7 @@ bool operator==(const CFileRef& a, const CFileRef& b)
         return a.valid_ == b.valid_;
     const std::string& path = a.url_->posixPath();
     if (!path.empty() && path == b.url_->posixPath())
-        return true; // one text leads to one item
+        return true; // equal texts lead to the same item
     return resolvedPath(a) == resolvedPath(b);
 }
 

@@ -1,4 +1,4 @@
-// Files made, deleted and measured by their references.
+// Making, deleting and measuring files by their references.
 #include "files/CFileUtil.h"
 #include "platform/SystemCalls.h"
 #include "platform/core/Status.h"
@@ -25,7 +25,7 @@ std::int32_t CFileUtilDelete(const CFileRef& file)
     platform::FileStatus status;
     if (!platform::systemCalls().linkStatus(path, &status))
         return PosixErrorToOSErr();
-    if (status.kind == platform::FileKind::directory) // which std::remove takes when it is empty
+    if (status.kind == platform::FileKind::directory) // std::remove would delete an empty folder
         return kStatusParameterError;
     return std::remove(path) == 0 ? kStatusOK : PosixErrorToOSErr();
 }

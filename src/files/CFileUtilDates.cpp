@@ -41,7 +41,7 @@ std::optional<platform::Date> valueOf(const std::optional<FileTime>& time)
 
 std::int32_t setDate(const CFileRef& file, FileDate date, double seconds)
 {
-    constexpr double farthest = 1e15; // 30 million years; beyond, and not a number, is no date
+    constexpr double farthest = 1e15; // 30 million years; a larger value, or a NaN, is no date
     const char* path = file.GetPath();
     if (path == nullptr || !(std::abs(seconds) <= farthest))
         return kStatusParameterError;

@@ -20,7 +20,7 @@ CFileRef resolved(const CFileRef& item)
                     false);
 }
 
-/// Whether an item, its links resolved, lies in such a folder of any domain.
+/// Whether an item, whose links are resolved, lies in a folder of that name in any domain.
 bool isInLibrary(const CFileRef& resolvedItem, const char* name)
 {
     for (const std::string& library : platform::libraryFolders()) {

@@ -8,7 +8,7 @@ using platform::String;
 
 namespace {
 
-/// A "~" in front is a name like any other here.
+/// Here a leading "~" is part of the name.
 platform::URLRef urlOf(const String& path)
 {
     return platform::URL::createWithFileSystemPath(path, platform::PathStyle::posix, /*isDirectory=*/false);
@@ -30,7 +30,7 @@ public:
         }
     }
 
-    /// Empty for a path that is none.
+    /// Empty if the path is invalid.
     const std::string& current() const { return current_; }
     void next() { current_ = stem_ + separator_ + std::to_string(++number_) + extension_; }
 
@@ -42,7 +42,7 @@ private:
     std::uint64_t number_ = 0;
 };
 
-/// A link to nowhere is something too: its name is taken.
+/// A dangling link takes its name too.
 bool isTaken(const std::string& path)
 {
     platform::FileStatus status;

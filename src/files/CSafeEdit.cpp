@@ -49,7 +49,7 @@ FileProblem CSafeEdit::Begin(const std::string& path, SafeEditOptions options)
     target_ = std::filesystem::canonical(path, error).string();
     if (error)
         return {Kind::system, error.value()};
-    // Whoever held the lock may have put a new file in the place of the one that was waited for.
+    // The holder of the lock may have put a new file at the path of the one that was waited for.
     for (bool isAtTarget = false; !isAtTarget;) {
         if (FileProblem problem = open())
             return problem;
@@ -65,8 +65,8 @@ FileProblem CSafeEdit::Begin(const std::string& path, SafeEditOptions options)
     return requireOneName();
 }
 
-// What a process left that was killed between its backup and the end of its edit is one file under two names. An edit
-// of a copy finishes that: the backup is the old content then.
+// A process that was killed between its backup and the end of its edit leaves one file under two names. An edit of a
+// copy completes that: the backup then holds the old content.
 FileProblem CSafeEdit::requireOneName() const
 {
     if (status_.links == 1)
@@ -88,7 +88,7 @@ bool CSafeEdit::isOwnBackup(const std::string& name) const
 std::string CSafeEdit::ownBackup() const
 {
     FileStatus found;
-    if (status_.links == 1) // not a look at every backup there is
+    if (status_.links == 1) // saves looking at every backup
         return "";
     for (int number = 0; number < kMostBackups; ++number) {
         std::string name = backupName(target_, number);
@@ -107,7 +107,7 @@ FileProblem CSafeEdit::open()
     return file_ ? FileProblem() : FileProblem::ofSystem();
 }
 
-// Without locks on this file system the look ahead of the rename is what is left.
+// On a file system without locks, the check ahead of the rename is the only protection.
 FileProblem CSafeEdit::waitForOthers()
 {
     if (platform::tryToLockFile(file_.get()) != platform::FileLockResult::busy)
@@ -141,6 +141,19 @@ FileProblem CSafeEdit::copyTo(CTemporaryFile& copy) const
     return CopyFileContent(file_.get(), copy.Descriptor(), options_.progress);
 }
 
+// Changes a copy that then takes the original's place. What is on disk after each step:
+//
+// 1. Create: an empty file ".NAME.ktfiles-N" in the same folder, locked by this process.
+// 2. The content, the change, and the attributes of the original, all in the copy; Commit flushes it.
+// 3. With a backup: the original under a second name as well, NAME.bak.
+// 4. Replace: NAME leads to the copy, in one rename.
+// 5. CommitFolder: the rename survives a power failure.
+//
+// Readers of NAME find the whole old file before 4 and the whole new one after it; those that have it open keep the old
+// one. Ctrl-C and other signals remove the copy up to 3 and wait from there on. A process that is killed before 3
+// leaves the copy, which the next edit of the file removes because nobody holds its lock; between 3 and 4 it also
+// leaves one file under two names, which the next edit completes (requireOneName). A power failure between 4 and 5 may
+// bring back the old file, whole.
 FileProblem CSafeEdit::applyToCopy(const Change& change)
 {
     const KeptTimes times = options_.keepTimes ? KeptTimes::all : KeptTimes::accessOnly;
@@ -149,7 +162,8 @@ FileProblem CSafeEdit::applyToCopy(const Change& change)
         return problem;
     if (FileProblem problem = refusedBy(change(copy.Path())))
         return problem;
-    if (FileProblem problem = requireUntouched(copy)) // else the copy would be blamed for what another program did
+    // Otherwise the copy would be blamed for what another program did.
+    if (FileProblem problem = requireUntouched(copy))
         return problem;
     if (FileProblem problem = refusedBy(LookAfter(file_.get(), copy.Descriptor())))
         return problem;
@@ -172,8 +186,10 @@ FileProblem CSafeEdit::applyToCopy(const Change& change)
     return copy.CommitFolder();
 }
 
-// The change is not undone when it fails or is cut short, so that signals must wait for its end. What it left behind
-// the content would stand in the way of the next one.
+// Changes the file itself. Nothing is rolled back when the change fails or is cut short, so signals wait for its end;
+// what a failed change left after the content is cut off, because it would stand in the way of the next one. A process
+// that is killed all the same leaves the file as far as the change had got: a backup, if one was asked for, was whole
+// and committed before the first write.
 FileProblem CSafeEdit::applyInPlace(const Change& change)
 {
     if (FileProblem problem = options_.backup ? backupByCopy() : FileProblem())

@@ -22,7 +22,7 @@ namespace {
 
 constexpr std::size_t kLongestName = 255; // of a component of a path, in bytes
 
-// The names to remove when a signal ends the process: plain memory, since a handler may use nothing else.
+// Names to remove when a signal ends the process. Plain memory, because a signal handler may use nothing else.
 struct Slot {
     enum State : int { free, beingFilled, used };
     std::atomic<int> state = free;
@@ -32,7 +32,7 @@ struct Slot {
 static_assert(std::atomic<int>::is_always_lock_free);
 std::array<Slot, 16> slots;
 
-// The file exists already and is empty; called with the signals held.
+// Called for a file that is still empty, with signals held.
 int takeSlot(int folder, const std::string& name)
 {
     for (std::size_t i = 0; i < slots.size(); ++i) {
@@ -49,11 +49,11 @@ int takeSlot(int folder, const std::string& name)
 }
 
 constexpr int kMostNames = 100;
-constexpr int kFirstNames = 4; // more than one edit takes at a time: what was left has one of these, nearly always
+// More than one edit takes at a time, so nearly every leftover has one of these.
+constexpr int kFirstNames = 4;
 
-// The names of all temporary files for a target, by a rule, so that those that were left are found without a look at
-// every name in the folder. A long name is cut so that the rest has room, at the start of a character: the library
-// opens only names that are UTF-8.
+// Names of all temporary files for a target follow one rule, so leftovers are found without listing the folder. A long
+// name is cut to make room for the rest, between two characters, because the library opens only names in UTF-8.
 std::string temporaryName(const std::string& target, int number)
 {
     constexpr std::size_t kRoom = kLongestName - std::string_view("..ktfiles-99").size();
@@ -68,8 +68,8 @@ bool statusOf(int folder, const std::string& name, FileStatus& status)
     return systemCalls().statusIn(folder, name.c_str(), &status);
 }
 
-// Only a file that nobody holds locked goes: its process is gone. Its name is compared once it is locked, since until
-// then it may have been given to another.
+// Removes the file only if nobody holds its lock, because its process is then gone. The name is checked again under the
+// lock, since it may have passed to another file before.
 void removeIfAbandoned(int folder, const std::string& name)
 {
     FileStatus named, opened;
@@ -104,7 +104,7 @@ bool CTemporaryFile::createAs(const std::string& name, FileProblem& problem)
     const SignalHold hold;
     OwnedDescriptor file(systemCalls().createFileIn(folder_.get(), name.c_str(), 0600));
     if (!file && errno == EEXIST) {
-        removeIfAbandoned(folder_.get(), name); // for the next one
+        removeIfAbandoned(folder_.get(), name); // so that the next edit may take it
         return false;
     }
     if (!file) {
@@ -112,7 +112,7 @@ bool CTemporaryFile::createAs(const std::string& name, FileProblem& problem)
         return false;
     }
     FileStatus status;
-    // Another process may have taken it for an abandoned one before it was locked.
+    // Another process may have locked the new file first, taking it for an abandoned one.
     if (platform::tryToLockFile(file.get()) == FileLockResult::busy || !systemCalls().status(file.get(), &status) ||
         status.links == 0)
         return false;
@@ -156,7 +156,7 @@ FileProblem CTemporaryFile::Commit() const
     return systemCalls().fsync(descriptor_.get()) == 0 ? FileProblem() : FileProblem::ofSystem();
 }
 
-// In a folder of somebody else's the name may have been given to another file.
+// In a folder that others may write to, the name may have passed to another file.
 FileProblem CTemporaryFile::requireItsName() const
 {
     FileStatus named, own;

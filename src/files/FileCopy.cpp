@@ -27,7 +27,7 @@ public:
     {
     }
 
-    /// Up to the end, with what came ahead of `begin` for a hole.
+    /// Copies up to `end`; the bytes ahead of `begin` are a hole.
     FileProblem extent(std::int64_t begin, std::int64_t end)
     {
         bool inSystem = true;
@@ -48,7 +48,8 @@ public:
     }
 
 private:
-    /// Through memory, where the system cannot copy between the two files itself. Bytes copied, 0 at the end of `from`.
+    /// Copies through memory where the system cannot copy between the two files. Returns the number of bytes, 0 at the
+    /// end of `from`.
     std::int64_t pieceByHand(std::int64_t offset, std::size_t count)
     {
         if (!buffer_)
@@ -89,7 +90,7 @@ FileProblem CopyFileContent(int from, int to, const FileCopyProgress& progress)
     for (std::int64_t position = 0; position < status.size;) {
         std::int64_t begin = 0, end = 0;
         if (!systemCalls().nextData(from, position, &begin, &end))
-            return errno == ENXIO ? copy.extent(status.size, status.size) // only a hole is left
+            return errno == ENXIO ? copy.extent(status.size, status.size) // only a hole remains
                                   : FileProblem::ofSystem();
         end = std::min<std::int64_t>(end, status.size);
         if (FileProblem problem = copy.extent(begin, end))
@@ -108,7 +109,8 @@ FileProblem CopyFileAttributes(int from, const platform::FileAttributes& attribu
     const bool isForeign = own.owner != attributes.owner || own.group != attributes.group;
     if (isForeign && systemCalls().setOwner(to, attributes.owner, attributes.group) != 0)
         return FileProblem::ofSystem(Kind::owner);
-    if (!platform::setPermissions(to, attributes.permissions)) // behind the owner, whose change takes set-id bits away
+    // Set after the owner, because a change of owner clears set-id bits.
+    if (!platform::setPermissions(to, attributes.permissions))
         return FileProblem::ofSystem();
     std::string lost;
     if (!platform::copyExtendedAttributes(from, to, lost))

@@ -13,7 +13,7 @@ void CombinedTaggingAifChunkReader::readChunk()
     const auto categories = UserData::read(file_, tagging::kCategories, 0);
     if (!basic && !categories)
         return;
-    if (auto* tags = chunk_.chunkDataOfClass<VireoLoopCombinedTagsChunkData>()) // without the archive in between
+    if (auto* tags = chunk_.chunkDataOfClass<VireoLoopCombinedTagsChunkData>()) // without the detour through an archive
         return tags->setDataDictionary(Types::combinedTagsChunkDataDictionaryFromAifChunks(
             basic ? BytesView(*basic) : BytesView(), categories ? BytesView(*categories) : BytesView()));
     const auto archive = Types::combinedAifChunkDataFrom(basic.value_or(Bytes()), categories.value_or(Bytes()));

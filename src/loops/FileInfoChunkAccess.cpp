@@ -16,7 +16,7 @@ namespace {
 constexpr const char* kKeys[] = {VireoLoopFileInfoChunkDataTitleKey, VireoLoopFileInfoChunkDataArtistKey,
                                  VireoLoopFileInfoChunkDataCopyrightKey, VireoLoopFileInfoChunkDataCommentsKey};
 
-/// The text of an AIFF text chunk: to its first NUL; none when it is not UTF-8.
+/// The text of an AIFF text chunk up to its first NUL; none if it is not UTF-8.
 std::optional<std::string> textIn(std::string_view key, BytesView data)
 {
     if (key == VireoLoopFileInfoChunkDataCommentsKey)
@@ -33,14 +33,13 @@ void FileInfoCafChunkReader::readChunk()
     Dictionary information;
     if (file_.information(information) != kStatusOK)
         return;
-    // The data object takes what it knows from the archive; an archive holds UTF-8 only, which entries of others may
-    // not be.
+    // The data object reads the archive, which holds UTF-8 only; entries of other programs may be in another encoding.
     std::erase_if(information, [](const auto& entry) {
         const auto* text = entry.second.template get<std::string>();
         return text == nullptr || !platform::String::fromUTF8(entry.first) || !platform::String::fromUTF8(*text);
     });
-    // Where the file says none of them the object stays as it is.
-    if (auto* info = chunk_.chunkDataOfClass<VireoLoopFileInfoChunkData>()) { // without the archive in between
+    // If the file holds none of these entries, the object stays as it is.
+    if (auto* info = chunk_.chunkDataOfClass<VireoLoopFileInfoChunkData>()) { // without the detour through an archive
         if (Dictionary known = InfoTypes::fileInfoChunkDataDictionaryFromCafInformation(information); !known.empty())
             info->setDataDictionary(std::move(known));
         return;
@@ -81,7 +80,7 @@ void FileInfoAifChunkReader::readChunk()
     }
     if (texts.empty())
         return;
-    if (auto* info = chunk_.chunkDataOfClass<VireoLoopFileInfoChunkData>()) // without the archive in between
+    if (auto* info = chunk_.chunkDataOfClass<VireoLoopFileInfoChunkData>()) // without the detour through an archive
         return info->setDataDictionary(InfoTypes::fileInfoChunkDataDictionaryFromAifTexts(texts));
     if (const auto archive = platform::archiveDictionary(texts))
         chunk_.chunkData().setChunkData(*archive, fourCC("AIFF"));

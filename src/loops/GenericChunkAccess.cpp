@@ -8,7 +8,7 @@ using UUIDUserData = VireoLoopUUIDUserDataUtils;
 
 namespace {
 
-/// Not in CAF: its id stands for no UUID, and the "uuid" items of others are not its own.
+/// Whether the chunk cannot be stored in CAF: its id stands for no UUID, and "uuid" items of others are not its own.
 bool hasNoPlaceInCAF(const VireoLoopBaseChunk& chunk)
 {
     return chunk.cafChunkID() == tagging::kCAFUUIDChunk && !chunk.cafChunkIsUUIDChunk();
@@ -54,7 +54,7 @@ void GenericAifChunkReader::readChunk()
 bool GenericAifChunkWriter::writeChunk()
 {
     if (chunk_.aifChunkID() == 0)
-        return true; // a chunk of CAF files only
+        return true; // such a chunk exists in CAF files only
     const auto data = chunk_.chunkData().chunkDataForAudioFileType(fourCC("AIFF"));
     return data && UserData::write(file_, chunk_.aifChunkID(), 0, *data);
 }

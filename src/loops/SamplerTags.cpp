@@ -68,7 +68,7 @@ void setFirst(std::optional<SamplerTagValue<T>>& value, From from, FourCC source
         value = SamplerTagValue<T>{static_cast<T>(from), source};
 }
 
-/// Takes one chunk after the other.
+/// Collects tags from one chunk after another.
 class Collector {
 public:
     explicit Collector(std::endian order) : order_(order) {}
@@ -115,7 +115,7 @@ private:
         rootIsOpen_ = !acid->has(AcidChunk::kRootNoteSet);
         if (!rootIsOpen_)
             addRoot(acid->rootNote, source);
-        if (isOnce) // what stands there then is what its writer never asked for
+        if (isOnce) // the rest of a one-shot's chunk is never filled in on purpose
             return;
         if (acid->beats > 0)
             setFirst(tags_.beats, std::uint32_t{acid->beats}, source);
@@ -151,7 +151,8 @@ private:
             addRoot(instrument->unshiftedNote, fourCC("inst"));
     }
 
-    // Samplers write middle C where nobody chose a note: beside an "acid" that leaves the root open it is none.
+    // Samplers write middle C if nobody chose a note, so that value is ignored beside an "acid" chunk without a root
+    // note.
     void addRoot(std::uint32_t note, FourCC source)
     {
         constexpr std::uint32_t middleC = 60;
@@ -192,7 +193,7 @@ private:
             tags_.texts.push_back({known->kind, std::string(text), source});
     }
 
-    // Points that "adtl" names; looked up by maps, for there may be millions.
+    // Adds the points that "adtl" names. Maps find them, since a file may have millions.
     void addCues()
     {
         if (!cues_)
@@ -249,8 +250,8 @@ private:
     static BytesView asBytes(const std::string& text) { return std::as_bytes(std::span(text)); }
 
     std::endian order_;
-    std::vector<FourCC> seen_; // a handful of kinds
-    bool rootIsOpen_ = false;  // "acid" says that there is none
+    std::vector<FourCC> seen_; // ids of chunks already added; only a handful
+    bool rootIsOpen_ = false;  // "acid" says that there is no root note
     std::optional<CueList> cues_;
     std::optional<AssociatedDataList> names_;
     std::optional<MarkerList> markers_;
@@ -303,7 +304,7 @@ bool SamplerTags::describeLoop(std::uint64_t frames) const
 {
     if (isLoop)
         return isLoop->value;
-    const std::uint64_t slack = frames / 100; // what editors leave at the ends
+    const std::uint64_t slack = frames / 100; // editors may leave this much at either end
     return frames > 0 && std::ranges::any_of(loops, [&](const Loop& loop) {
                return loop.firstFrame <= slack && loop.lastFrame < frames && loop.lastFrame + 1 >= frames - slack;
            });

@@ -22,15 +22,15 @@ std::string textFor(const Dictionary& tags, const char* key)
     return text != nullptr ? *text : std::string();
 }
 
-/// The text of a 50-byte field: up to its first NUL.
+/// The text of a 50-byte field up to its first NUL.
 std::string_view fieldText(const std::byte* field)
 {
     const auto* text = reinterpret_cast<const char*>(field);
     return {text, strnlen(text, kCategoryTextSize)};
 }
 
-/// A field's text, or the empty string when it is not UTF-8. A writer that cut a long text in the midst of a character
-/// leaves an incomplete one at the end, which is dropped.
+/// A field's text, or an empty string if it is not UTF-8. An incomplete last character, which is what a writer leaves
+/// that cuts a long text, is dropped.
 std::string fieldTextOrNothing(const std::byte* field)
 {
     std::string_view text = fieldText(field);
@@ -44,7 +44,7 @@ std::string fieldTextOrNothing(const std::byte* field)
     return {};
 }
 
-/// `text`, cut at 49 bytes, NULs behind it.
+/// `text` cut to 49 bytes and filled up with NULs.
 CategoryText field(std::string_view text)
 {
     CategoryText to{};
@@ -60,7 +60,7 @@ void readBasicTagging(BytesView bytes, Dictionary& tags)
     std::memcpy(&basic, bytes.data(), sizeof basic);
     tagging::SwapBasicTaggingChunkToHost(&basic);
     const std::pair<const char*, std::int64_t> numbers[] = {
-        // in the order of the dictionary, each behind the others
+        // In the order of the dictionary.
         {VireoLoopCombinedTagsChunkDataBeatCountKey, basic.beatCount},
         {VireoLoopCombinedTagsChunkDataFileTypeKey, basic.fileType},
         {VireoLoopCombinedTagsChunkDataKeyType, basic.keyType},
@@ -72,7 +72,7 @@ void readBasicTagging(BytesView bytes, Dictionary& tags)
         tags.emplace_hint(tags.end(), key, number);
 }
 
-/// The descriptors that the bytes hold, at most `claimed`; one that is not UTF-8 is skipped.
+/// Reads at most `claimed` descriptors, as many as the bytes hold; skips one that is not UTF-8.
 platform::Array descriptorsIn(BytesView bytes, std::size_t claimed)
 {
     std::vector<std::string_view> texts;

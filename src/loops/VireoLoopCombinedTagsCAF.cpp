@@ -25,7 +25,7 @@ std::vector<std::string> split(std::string_view text, char separator)
     }
 }
 
-/// The first element under a key; null when there is none.
+/// The first element under a key; null if there is none.
 const std::string* firstOf(const SearchInfo& info, const char* key)
 {
     const auto found = info.find(key);
@@ -62,7 +62,7 @@ void addTexts(const Dictionary& tags, tagging::StringPairs& strings)
     for (const platform::Value& value : *descriptors)
         if (const auto* text = value.get<std::string>()) {
             joined += separator + *text;
-            separator = ","; // ahead of the next one, even when this one is empty
+            separator = ","; // precedes the next text, even if this one is empty
         }
     strings["descriptors"] = joined;
 }

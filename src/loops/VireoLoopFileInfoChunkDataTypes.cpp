@@ -40,7 +40,7 @@ std::string textFor(const Dictionary& dictionary, std::string_view key)
     return text != nullptr ? *text : std::string();
 }
 
-/// The texts of `from` under other keys; empty ones are left out.
+/// The texts of `from` under other keys, without empty ones.
 Dictionary rekeyed(const Dictionary& from, const char* FileInfoKey::*fromKey, const char* FileInfoKey::*toKey)
 {
     Dictionary to;
@@ -50,7 +50,8 @@ Dictionary rekeyed(const Dictionary& from, const char* FileInfoKey::*fromKey, co
     return to;
 }
 
-/// The size of the white space at an end of a text; 0 for none. Unicode's, in UTF-8, and NUL.
+/// The size of the white space character that a text begins or ends with; 0 if it has none. White space is Unicode's,
+/// in UTF-8, and NUL.
 std::size_t whiteSpaceAt(std::string_view text, bool (std::string_view::*isAt)(std::string_view) const noexcept)
 {
     using namespace std::string_view_literals;
@@ -148,13 +149,13 @@ std::optional<std::string> VireoLoopFileInfoChunkDataTypes::commentStringFromAif
 
 Bytes VireoLoopFileInfoChunkDataTypes::commentDataFromAifCommentChunkStrings(std::string_view comment)
 {
-    // Kept: the space ahead of the text, and the 8 zero bytes behind it that no count covers, are part of the format.
+    // Kept: the format has a space ahead of the text and 8 zero bytes behind it, which no count includes.
     std::string text = " " + std::string(trimmed(comment));
     constexpr std::size_t limit = std::numeric_limits<std::uint16_t>::max();
     if (text.size() > limit) {
         text.resize(limit);
         while (!platform::String::fromUTF8(text) && text.size() > limit - 4)
-            text.pop_back(); // a character that the cut went through
+            text.pop_back(); // a character that was cut in two
     }
     ByteWriter writer;
     writer.write(std::uint16_t{1}); // comments

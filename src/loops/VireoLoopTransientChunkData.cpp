@@ -16,7 +16,8 @@ using tagging::TransientsChunk;
 
 namespace {
 
-/// How many records of `recordSize` bytes the data behind a head of `headSize` bytes can hold, at most `claimed`.
+/// The number of records of `recordSize` bytes after a head of `headSize` bytes: at most `claimed`, and at most what
+/// fits.
 std::size_t recordsThere(std::int64_t claimed, std::size_t dataSize, std::size_t headSize, std::size_t recordSize)
 {
     const auto room = static_cast<std::int64_t>((dataSize - headSize) / recordSize);
@@ -34,7 +35,7 @@ void VireoLoopTransientChunkData::readFromAIFData(BytesView data)
 {
     if (data.size() < sizeof(TransientsChunk))
         return;
-    // The count is bounded before the swap, which trusts it.
+    // The count is bounded first, because the byte swap trusts it.
     const std::size_t count = recordsThere(loadBE<std::int32_t>(data.data() + offsetof(TransientsChunk, count)),
                                            data.size(), sizeof(TransientsChunk), sizeof(TransientRecord));
     Bytes copy(data.begin(),
@@ -64,7 +65,7 @@ try {
     auto* record = reinterpret_cast<TransientRecord*>(chunk + 1);
     for (const VireoLoopTransient& transient : _transients) {
         record->type = static_cast<std::int16_t>(transient.transientType());
-        record->frame = static_cast<std::uint32_t>(transient.frame()); // the low 32 bits: all that AIFF holds
+        record->frame = static_cast<std::uint32_t>(transient.frame()); // AIFF holds only the low 32 bits
         ++record;
     }
     tagging::SwapBasicTransientsChunkToBig(chunk);

@@ -14,7 +14,7 @@ constexpr std::int64_t kMostRecords =
 constexpr std::int64_t kMostCAFRecords =
     (UINT32_MAX - tagging::kUUIDSize - sizeof(tagging::CAFTransientsPayload)) / sizeof(tagging::CAFTransientRecord);
 
-/// What the chunk held up to its count, then the count and a record for each position.
+/// Builds the chunk from its old bytes up to the count, the new count, and a record for each position.
 Bytes transientsChunk(BytesView old, const std::int64_t* positions, std::int64_t count)
 {
     ByteWriter writer;

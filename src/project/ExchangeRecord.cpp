@@ -15,7 +15,7 @@ namespace {
 constexpr const char* kName = ".exchange.dummy";
 constexpr const char* kUnfinishedName = ".exchange.dummy.new";
 constexpr const char* kBackupKey = "Backup";
-constexpr const char* kItemsKey = "Items"; // per name of kExchangedNames: the inode numbers in alternative and backup
+constexpr const char* kItemsKey = "Items"; // for each exchanged name, the inode numbers in alternative and backup
 
 bool isFolderName(const std::string& name)
 {
@@ -64,7 +64,7 @@ bool ExchangeRecord::write(const std::string& alternativeFolder) const
 {
     const platform::SystemCalls& calls = platform::systemCalls();
     const std::string unfinished = alternativeFolder + '/' + kUnfinishedName;
-    if (calls.removeFile(unfinished.c_str()) != 0 && errno != ENOENT) // of one that was killed
+    if (calls.removeFile(unfinished.c_str()) != 0 && errno != ENOENT) // left by a process that was killed
         return false;
     const int descriptor = calls.createFile(unfinished.c_str(), 0666);
     if (descriptor < 0)

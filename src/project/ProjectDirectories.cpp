@@ -16,10 +16,10 @@ namespace {
 
 enum class In { nothing, media, alternative };
 
-/// Of the package kinds. `folder` is the name in a project folder; empty is the project folder itself.
+/// A folder of the package kinds. `folder` is its name in a project folder; empty means the project folder itself.
 struct PackageDirectory {
     In in = In::nothing;
-    const char* inside = ""; // in "Media", or in the alternative's folder
+    const char* inside = ""; // relative to "Media" or to the alternative's folder
     const char* folder = "";
 };
 
@@ -46,7 +46,8 @@ constexpr std::array<PackageDirectory, 20> kPackageDirectories{{
     {In::media, "Samples/Quick Sampler", "Samples/Quick Sampler"},
 }};
 
-/// Of the older kinds, right under the base; null for none. "band" and "mwand" differ from the others in few.
+/// A folder of the older kinds, directly under the base; null if a kind has none. "band" and "mwand" rarely differ from
+/// the others.
 struct OlderDirectory {
     const char* plain; // types 1 and 6
     const char* band;  // type 2
@@ -101,14 +102,14 @@ URLRef parentOf(const URLRef& url)
     return url ? url->deletingLastPathComponent() : nullptr;
 }
 
-/// Whether the name is there, also as a link to nothing.
+/// Whether the name exists, even as a dangling link.
 bool entryExists(const std::string& path)
 {
     platform::FileStatus status;
     return !path.empty() && platform::systemCalls().linkStatus(path.c_str(), &status);
 }
 
-/// `name` may be empty, for the folder itself.
+/// `name` may be empty, which means the folder itself.
 URLRef below(const URLRef& folder, const char* name)
 {
     return *name == '\0' ? folder : itemIn(folder, name, true);
@@ -121,7 +122,7 @@ bool createFolder(const URLRef& url)
 
 URLRef nearestPackage(const URLRef& url)
 {
-    std::string path = pathOf(url).empty() ? "" : standardizedPath(pathOf(url)); // "x.band/../y" lies in no package
+    std::string path = pathOf(url).empty() ? "" : standardizedPath(pathOf(url)); // "x.band/../y" is not in a package
     while (path.size() > 1) {
         if (platform::isFilePackage(String::fromUTF8(path)))
             return platform::URL::createWithFileSystemPath(String::fromUTF8(path), platform::PathStyle::posix, true);
@@ -188,7 +189,7 @@ CFileRef GetProjectDirectoryRefForBase(const CFileRef& base, TTypeDir_Prj type, 
             directory = isInMedia ? below(itemIn(package, ProjectLayout::media, true), names.inside)
                                   : below(root, names.folder);
     }
-    // Kept: the base is created also for what there is no folder for
+    // Kept: the base is created even for a type without a folder
     if ((create && !createFolder(root)) || !directory)
         return CFileRef();
     if (create &&

@@ -11,11 +11,11 @@ using platform::Error;
 
 namespace {
 
-/// The name to which an item steps aside on a file system that cannot exchange two names in one step.
+/// The name that an item takes temporarily on a file system that cannot exchange two names in one step.
 constexpr const char* kStagedExtension = ".dummy";
 constexpr int kConflictCode = 2;
 
-/// The inode number of what has the name, 0 for nothing; false, with errno, when that cannot be told.
+/// Gets the inode number at the path, 0 if nothing is there; false, with errno, if it cannot be determined.
 bool itemAt(const std::string& path, std::uint64_t& inode)
 {
     platform::FileStatus status;
@@ -54,7 +54,7 @@ bool ProjectExchange::look(const Places& places, Found& found)
            itemAt(places.staged, found.staged);
 }
 
-/// Whether the items that are there are others than those recorded.
+/// Whether the items on disk differ from those in the record.
 bool ProjectExchange::isConflict(const ExchangeItem& item, const Found& found)
 {
     std::array<std::uint64_t, 3> recorded{item.inAlternative, item.inBackup, 0};
@@ -64,6 +64,10 @@ bool ProjectExchange::isConflict(const ExchangeItem& item, const Found& found)
     return recorded != there;
 }
 
+/// The record comes first, whole and flushed with its folder, so that no name moves without it; then the items move,
+/// one rename at a time (step); both folders are flushed; the record goes last. A process that dies while the record is
+/// there leaves each item in one of the places that the record allows for, and nothing is ever replaced or deleted, so
+/// a later call completes or undoes the exchange (settle).
 bool ProjectExchange::run(const std::string& backupInRecord, Error* error)
 {
     ExchangeRecord record{backupInRecord, {}};
@@ -72,7 +76,7 @@ bool ProjectExchange::run(const std::string& backupInRecord, Error* error)
         Found found;
         if (!look(places, found))
             return failWithSystemError(error);
-        if (found.staged != 0) { // it may be all that is left of somebody's data
+        if (found.staged != 0) { // it may be all that is left of a user's data
             errno = EEXIST;
             return failWithSystemError(error, places.staged);
         }
@@ -133,7 +137,7 @@ bool ProjectExchange::moveItem(const ExchangeItem& item, Side side) const
         if (!look(places, found))
             return false;
         if (isConflict(item, found)) {
-            errno = EBUSY; // somebody replaced it under our hands
+            errno = EBUSY; // another process replaced it meanwhile
             return false;
         }
         if (found.alternative == (there ? item.inBackup : item.inAlternative) &&
@@ -146,7 +150,19 @@ bool ProjectExchange::moveItem(const ExchangeItem& item, Side side) const
     return false;
 }
 
-/// One renaming towards the side. Each leads to a state from which both sides can be reached by the names alone.
+/// Renames once, towards the side. Items are told apart by inode number, which renaming keeps, so what stands where
+/// always says how far the exchange got. On a file system that cannot exchange two names, an exchange takes three
+/// renames; A and B are the items that began in the alternative and in the backup:
+///
+///   alternative  staged  backup
+///   A            -       B       the record is on disk, nothing has moved
+///   -            A       B       1. the alternative's item steps aside
+///   B            A       -       2. the backup's item takes its place
+///   B            -       A       3. the first item takes the place in the backup
+///
+/// From each line one more rename leads on, or back towards the first line. A process that dies anywhere leaves one of
+/// these lines and the record, by which the next exchange of the alternative, or a command to settle, completes or
+/// undoes the rest.
 bool ProjectExchange::step(const ExchangeItem& item, Side side, const Places& places, const Found& found) const
 {
     if (found.staged != 0) {
@@ -166,7 +182,8 @@ bool ProjectExchange::step(const ExchangeItem& item, Side side, const Places& pl
     return isUnknown && rename(places.alternative, places.staged);
 }
 
-/// The places are made durable ahead of the record's end, so that no power cut leaves an exchange without a record.
+/// Commits the new places to disk before the record is removed, so that no power failure leaves an exchange without its
+/// record.
 bool ProjectExchange::sync() const
 {
     const platform::SystemCalls& calls = platform::systemCalls();
@@ -178,6 +195,6 @@ bool ProjectExchange::forget()
     const platform::SystemCalls& calls = platform::systemCalls();
     if (calls.removeFile(ExchangeRecord::pathIn(alternativeFolder_).c_str()) != 0)
         return false;
-    calls.syncFolder(alternativeFolder_.c_str()); // what is settled may be found settled once more
+    calls.syncFolder(alternativeFolder_.c_str()); // settling once more what is settled does no harm
     return true;
 }

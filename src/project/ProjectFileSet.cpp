@@ -25,7 +25,7 @@ ProjectFileSet::ProjectFileSet(std::initializer_list<std::string_view> paths)
         insert(path);
 }
 
-/// The slot of the path, or the free one that it would take.
+/// The slot of the path, or the free slot that it would take.
 const ProjectFileSet::Slot* ProjectFileSet::find(std::string_view path, std::uint32_t hash) const
 {
     for (std::size_t i = hash;; ++i) {
@@ -42,7 +42,7 @@ bool ProjectFileSet::insert(std::string_view path)
 
 void ProjectFileSet::insert(std::span<const std::string> paths)
 {
-    constexpr std::size_t most = 32; // reads that are under way at a time
+    constexpr std::size_t most = 32; // reads in flight at a time
     for (; !paths.empty(); paths = paths.subspan(std::min(most, paths.size()))) {
         const auto some = paths.first(std::min(most, paths.size()));
         std::array<std::uint32_t, most> hashes;

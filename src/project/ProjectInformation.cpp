@@ -1,4 +1,4 @@
-// The package at large: its names, and what the metadata of its alternatives says.
+// The package as a whole: its names, and what the metadata of its alternatives says.
 #include "project/ProjectInformation.h"
 
 #include "platform/PropertyList.h"
@@ -16,7 +16,7 @@ using platform::Value;
 
 namespace {
 
-/// Digits alone, zeros at the front or not; null for what is too large to be an index.
+/// The value of a key that is all digits, with or without leading zeros; null if it is too large for an index.
 std::optional<long> indexOf(const std::string& key)
 {
     std::uint32_t index = 0;

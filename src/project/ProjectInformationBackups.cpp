@@ -1,4 +1,4 @@
-// Backups of alternatives: listed, named, purged.
+// Backups of alternatives: listing, naming, purging.
 #include "platform/Folders.h"
 #include "platform/SystemCalls.h"
 #include "project/ProjectLayout.h"
@@ -11,11 +11,12 @@ using platform::URLRef;
 
 namespace {
 
-/// A backup that is being deleted: hidden, so that one of which half is left is none any more.
+/// The prefix of a backup that is being deleted. It hides the folder, so that a half-deleted backup does not pass for
+/// one.
 constexpr const char* kDeletedPrefix = ".deleted-";
 constexpr int kMostLeftovers = 100;
 
-/// Whether a new backup may have the name: nothing has it, or a folder in which nothing is.
+/// Whether a new backup may take the name: it is unused, or that of an empty folder.
 bool isFree(const std::string& path)
 {
     platform::FileStatus status;
@@ -25,7 +26,7 @@ bool isFree(const std::string& path)
     return names && names->empty();
 }
 
-/// Hidden first, then removed.
+/// Hides the backup first, then removes it.
 bool deleteBackup(const std::string& path)
 {
     const std::size_t name = path.rfind('/') + 1;
@@ -34,14 +35,14 @@ bool deleteBackup(const std::string& path)
         const std::string hidden = number == 0 ? doomed : doomed + '-' + std::to_string(number);
         platform::FileStatus status;
         if (platform::systemCalls().linkStatus(hidden.c_str(), &status) && !platform::removeTree(hidden))
-            continue; // left by one that was killed, and somebody else's
+            continue; // a leftover of a process that was killed, or somebody else's
         return platform::systemCalls().renameWithoutReplacing(path.c_str(), hidden.c_str()) == 0 &&
                platform::removeTree(hidden);
     }
     return false;
 }
 
-/// What of an alternative's backups may be deleted, in the order of the list.
+/// Chooses which backups of an alternative may be deleted, in the order of the list.
 class Purge {
 public:
     Purge(const URLRef& bundleURL, long variantIndex)
@@ -51,14 +52,14 @@ public:
     }
 
     const std::vector<ProjectBackup>& backups() const { return backups_; }
-    /// One that takes part in an exchange that was cut short holds data of the alternative; when nobody knows which one
-    /// that is, it may be any.
+    /// Whether the backup takes part in an exchange that was cut short and so holds data of the alternative. If the
+    /// record does not say which backup that is, any may be.
     bool isTaken(const std::string& path) const
     {
         return interrupted_ && (!interrupted_->backupURL || isSameItem(path, pathOf(interrupted_->backupURL)) ||
                                 path == pathOf(interrupted_->backupURL));
     }
-    /// The first that may go, as many as there are too many. `kept` is not among them.
+    /// The oldest that may go, as many as are over the limit. `kept` is never among them.
     std::vector<std::string> doomed(std::size_t count, const std::string& kept = "") const
     {
         std::vector<std::string> paths;
@@ -68,8 +69,8 @@ public:
                 paths.push_back(path);
         return paths;
     }
-    /// The one that was changed last goes last: somebody's newest work was put there, by a backup or an exchange,
-    /// however old its data is.
+    /// Moves the backup that was changed last to the end: a backup or an exchange put the user's newest work there,
+    /// however old the data in it is.
     void putLastChangedLast()
     {
         const auto changed = [](const ProjectBackup& backup) {
@@ -101,7 +102,8 @@ std::vector<ProjectBackup> ProjectInformation::backupsForBundleURL(const URLRef&
             continue;
         const URLRef url = itemIn(base, name.c_str(), true); // null for a name that is no text
         const std::string& path = pathOf(url);
-        platform::FileStatus status; // a link to a folder is none: what it leads to is somebody else's
+        // A link to a folder is no backup: its target belongs to somebody else.
+        platform::FileStatus status;
         if (path.empty() || !platform::systemCalls().linkStatus(path.c_str(), &status) ||
             status.kind != platform::FileKind::directory)
             continue;
@@ -109,7 +111,7 @@ std::vector<ProjectBackup> ProjectInformation::backupsForBundleURL(const URLRef&
             backups.push_back({url, *date});
     }
     std::stable_sort(backups.begin(), backups.end(), [](const ProjectBackup& a, const ProjectBackup& b) {
-        return a.date.secondsSince2001 < b.date.secondsSince2001; // the names are in order already
+        return a.date.secondsSince2001 < b.date.secondsSince2001; // the names are sorted already
     });
     return backups;
 }
@@ -130,10 +132,10 @@ URLRef ProjectInformation::urlForNewBackupForBundleURL(const URLRef& bundleURL, 
     const std::vector<std::string> doomed = purge.doomed(tooMany);
     if (doomed.size() < tooMany)
         return nullptr;
-    // The name comes first: without one nothing is deleted.
+    // The name is chosen first: without one nothing is deleted.
     for (std::size_t tried = 0; tried < most; ++tried) {
         char name[16];
-        const std::size_t number = (there - tooMany + tried) % most; // round to 00 and up
+        const std::size_t number = (there - tooMany + tried) % most; // wraps around to 00
         std::snprintf(name, sizeof name, "%02u", static_cast<unsigned>(number));
         const std::string path = pathOf(itemIn(base, name, true));
         const bool isDoomed = std::find(doomed.begin(), doomed.end(), path) != doomed.end();

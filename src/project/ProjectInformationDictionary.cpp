@@ -1,4 +1,4 @@
-// The information dictionary: read, converted between its two forms of names, and written.
+// The information dictionary: reading, converting between its two sets of keys, writing.
 #include "project/ProjectInformation.h"
 
 #include "platform/ApplicationInfo.h"
@@ -49,7 +49,7 @@ std::optional<std::string> ProjectInformation::projectDisplayNameWithoutExtensio
     if (!location)
         return std::nullopt;
     platform::String name = platform::displayName(*location);
-    if (name.isNull()) // not there (yet): what it would be called
+    if (name.isNull()) // the item does not exist (yet): use the name it would have
         name = location->copyLastPathComponent();
     if (name.isNull())
         return std::nullopt;
@@ -123,7 +123,8 @@ bool ProjectInformation::writeInfoDictionaryToURL(const Dictionary& info, const 
     const auto bytes = platform::writePropertyList(info, platform::PropertyListFormat::binary, error);
     if (!bytes)
         return false;
-    // Kept: into the file itself, which keeps its links; who needs the old one to survive writes to another name
+    // Kept: writes into the file itself, which keeps its links; a caller who needs the old one to survive writes to
+    // another name
     return platform::writeSmallFile(pathOf(url).c_str(), *bytes) || failWithSystemError(error);
 }
 

@@ -1,4 +1,4 @@
-// Exchanges of an alternative's data with a backup's, and what is left of one that was cut short.
+// Exchanges an alternative's data with a backup's, and settles an exchange that was cut short.
 #include "platform/Log.h"
 #include "platform/SmallFile.h"
 #include "platform/SystemCalls.h"
@@ -16,11 +16,11 @@ namespace {
 constexpr int kMissingDataCode = 1;
 constexpr std::size_t kLargestRecord = 1 << 20;
 
-/// An alternative's folder, and what its record of an exchange says, if there is one.
+/// An alternative's folder and the record of an exchange in it, if there is one.
 struct Alternative {
     std::string package, folder;
     bool hasRecord = false;
-    std::optional<ExchangeRecord> record; // none of one that is not understood
+    std::optional<ExchangeRecord> record; // none if it is not understood
 
     std::string backups() const { return folder + '/' + ProjectLayout::backups; }
     std::string recordedBackup() const
@@ -29,7 +29,7 @@ struct Alternative {
     }
 };
 
-/// None, with `error`, when the package has no such alternative.
+/// None, with `error`, if the package has no such alternative.
 std::optional<Alternative> alternativeOf(const URLRef& bundleURL, long index, Error* error)
 {
     auto folder = ProjectInformation::pathForVariant(index, bundleURL, AcceptMissing::no);
@@ -48,7 +48,8 @@ std::optional<Alternative> alternativeOf(const URLRef& bundleURL, long index, Er
     return alternative;
 }
 
-/// The path of a backup's folder, as it is spelt: ".." behind a link is the system's to follow. Empty for none.
+/// The path of a backup's folder as it is spelt, because ".." after a link is for the system to resolve. Empty if there
+/// is none.
 std::string folderPath(const URLRef& url)
 {
     std::string path = pathOf(url);
@@ -57,7 +58,8 @@ std::string folderPath(const URLRef& url)
     return path;
 }
 
-/// What a record calls a backup's folder: its name where it is one of the alternative's, however it is spelt.
+/// The name by which a record refers to a backup: the folder's name if it is one of the alternative's, however it is
+/// spelt.
 std::string nameInRecord(const Alternative& alternative, const std::string& backup)
 {
     const std::string name = backup.substr(backup.rfind('/') + 1);
@@ -65,8 +67,8 @@ std::string nameInRecord(const Alternative& alternative, const std::string& back
     return isName && isSameItem(backup, alternative.backups() + '/' + name) ? name : backup;
 }
 
-/// Whether a backup is where it seems to be; false with `error` for one that is a link, or reached by one in the
-/// package: a package comes from anywhere, and could name any folder so.
+/// Refuses a backup that is a link or is reached through one inside the package: packages come from anywhere, and a
+/// link could name any folder.
 bool requireNoLink(const Alternative& alternative, const std::string& name, Error* error)
 {
     platform::FileStatus status;
@@ -84,7 +86,7 @@ bool failOfUnreadableRecord(const Alternative& alternative, Error* error)
                               " cannot be read; it tells of an exchange that was cut short");
 }
 
-/// Completes or undoes what the record tells of, `backup` being the folder that it means.
+/// Completes or undoes the exchange that the record describes; `backup` is the folder that it means.
 bool settle(const Alternative& alternative, const std::string& backup, bool completes, Error* error)
 {
     const ExchangeRecord& record = *alternative.record;
@@ -125,7 +127,7 @@ bool ProjectInformation::exchangeDataOfProjectAtURL(const URLRef& bundleURL, lon
     if (alternative->record) {
         const std::string recorded = alternative->recordedBackup();
         const bool isSame = alternative->record->backup == name || isSameItem(recorded, backup);
-        // One that came to its end is not undone, whatever the user has worked since: only its record is left to go.
+        // An exchange that was completed is not undone, since the user may have worked on: only its record is removed.
         const bool isComplete =
             ProjectExchange(alternative->folder, isSame ? backup : recorded).isComplete(*alternative->record);
         if (!isSame && !isComplete && recorded == alternative->record->backup)

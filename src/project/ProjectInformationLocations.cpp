@@ -1,4 +1,4 @@
-// Where things lie in a package.
+// Where items lie in a package.
 #include "platform/Folders.h"
 #include "platform/SystemCalls.h"
 #include "project/ProjectLayout.h"
@@ -68,7 +68,7 @@ bool hasLinkBelow(const std::string& folder, const std::string& path)
 
 namespace {
 
-/// "Alternatives/000"; empty for what is no index.
+/// "Alternatives/000"; empty if the number is no index.
 std::string variantName(const char* generation, long index)
 {
     if (index < 0 || index > long{std::numeric_limits<std::uint32_t>::max()})
@@ -78,7 +78,7 @@ std::string variantName(const char* generation, long index)
     return std::string(generation) + '/' + number;
 }
 
-/// An item of an alternative: a file, around which folders are created.
+/// A file of an alternative; `create` makes the folders around it.
 URLRef fileOfVariant(const URLRef& bundleURL, long index, const char* name, CreateDirectories create)
 {
     return itemIn(ProjectInformation::variantBaseURLForBundleURL(bundleURL, index, create), name, false);

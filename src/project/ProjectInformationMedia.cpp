@@ -24,7 +24,7 @@ void ProjectInformation::addFiles(ProjectFileSet& files, ProjectMediaKind kind, 
     if (list == nullptr)
         return;
     const ProjectMediaPaths paths(standardizedPath(pathOf(projectURL_)), hasProjectFolder());
-    std::array<std::string, 32> made; // their memory is used again and again
+    std::array<std::string, 32> made; // reused, so that their memory is allocated once
     std::size_t count = 0;
     for (const platform::Value& element : *list) {
         const auto* stored = element.get<std::string>();

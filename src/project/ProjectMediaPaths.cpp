@@ -7,7 +7,7 @@ namespace {
 constexpr std::string_view kPackageMark = ".fuguex/";
 constexpr std::string_view kMediaPrefix = "Media/";
 
-/// Where the mark ends for the first time; npos when it is not there.
+/// Where the first package mark ends; npos if there is none.
 std::size_t endOfPackageMark(std::string_view path)
 {
     for (std::size_t dot = path.find('.'); dot != path.npos; dot = path.find('.', dot + 1))
@@ -16,8 +16,8 @@ std::size_t endOfPackageMark(std::string_view path)
     return path.npos;
 }
 
-/// Whether the standardizing of what stands behind a slash would change nothing, which is nearly always so: no empty
-/// component, and none that begins with a dot. A hidden name takes the long road too.
+/// Whether standardizing the part behind a slash would change nothing: it has no empty component and none that begins
+/// with a dot, which is true of nearly every path. Hidden names take the long road too.
 bool isStandardized(std::string_view path)
 {
     if (path.empty() || path.front() == '.' || path.front() == '/' || path.back() == '/')
@@ -65,7 +65,7 @@ bool ProjectMediaPaths::makeAbsolute(std::string_view stored, std::string& resul
         stored.remove_prefix(inside);
         result = package_;
     } else if (stored.front() == '/') {
-        result = stored; // as it is: standardized by its text it could lead past a link to another file
+        result = stored; // unchanged: standardized as text it could lead past a link to another file
         return true;
     } else {
         result = mediaBase_;

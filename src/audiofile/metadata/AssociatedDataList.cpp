@@ -4,7 +4,7 @@ namespace {
 
 constexpr FourCC kRange = fourCC("ltxt"), kFile = fourCC("file");
 
-/// The point that an item speaks of; none of items of other kinds, and of one that ends ahead of it.
+/// The cue point that an item describes; none for items of other kinds and for one that ends before its id.
 std::optional<std::uint32_t> cueIdOf(const ListItem& item, std::endian order)
 {
     const bool speaks = item.id == fourCC("labl") || item.id == fourCC("note") || item.id == kRange || item.id == kFile;
@@ -13,7 +13,7 @@ std::optional<std::uint32_t> cueIdOf(const ListItem& item, std::endian order)
                : std::nullopt;
 }
 
-/// Whether the item is of the kind and speaks of the point.
+/// Whether the item is of this kind and describes this cue point.
 auto speaksOf(FourCC id, std::uint32_t cueId, std::endian order)
 {
     return [=](const ListItem& item) {

@@ -45,7 +45,7 @@ std::optional<CAFRegionList> CAFRegionList::read(BytesView body)
     const auto count = reader.read<std::uint32_t>();
     if (!reader.ok())
         return std::nullopt;
-    // Behind markers that are not all there no region begins.
+    // If some markers are missing, no region follows.
     while (list.regions.size() < count && reader.remaining() >= kRegionHeaderSize &&
            (list.regions.empty() || list.regions.back().missingMarkers == 0)) {
         CAFRegion& region = list.regions.emplace_back();

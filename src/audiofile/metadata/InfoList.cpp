@@ -6,7 +6,7 @@
 
 namespace {
 
-// In the order of ids. The first edition of the standard registers 23; the others are in wide use since.
+// Sorted by id. The first edition of the standard registers 23; the others have been in wide use since.
 constexpr auto kWords = std::to_array<std::pair<FourCC, std::string_view>>({
     {fourCC("CODE"), "Encoded by"},
     {fourCC("DTIM"), "Date and time original"},

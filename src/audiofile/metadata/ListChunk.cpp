@@ -15,7 +15,7 @@ bool isIdCharacter(std::byte byte)
     return (c >= '0' && c <= '9') || (c >= 'A' && c <= 'Z') || (c >= 'a' && c <= 'z') || c == ' ';
 }
 
-/// Whether an item begins where a pad byte should stand: some writers leave that byte out.
+/// Whether an item begins where a pad byte should stand: some writers omit that byte.
 bool beginsAnItem(BytesView bytes, std::endian order)
 {
     return bytes.size() >= kItemHeaderSize && std::ranges::all_of(bytes.first(4), isIdCharacter) &&
@@ -70,7 +70,7 @@ void ListChunk::replaceBody(std::size_t index, Bytes body)
 
 void ListChunk::insert(std::size_t index, FourCC id, Bytes body)
 {
-    // What ended with the list no longer does.
+    // An item that ended with the list no longer does.
     if (index != 0 && index == items_.size())
         items_.back().missing = 0;
     items_.insert(items_.begin() + static_cast<std::ptrdiff_t>(index), {.id = id, .body = std::move(body)});
@@ -83,7 +83,8 @@ void ListChunk::erase(std::size_t index)
     settlePadding();
 }
 
-// Whether a byte is padding was told by what followed, which an edit changes: from now on it tells itself.
+// Gives every item a pad byte of its own. Reading inferred a missing one from the item that follows, which an edit may
+// change.
 void ListChunk::settlePadding()
 {
     for (ListItem& item : items_) {

@@ -14,7 +14,7 @@ bool needsPad(std::size_t nameLength)
     return (1 + nameLength) % 2 != 0;
 }
 
-/// Those of `count` markers that are there whole; the last may lack its pad byte.
+/// Reads those of `count` markers that are complete; the last may lack its pad byte.
 MarkerList markersOf(ByteReader reader, std::uint16_t count, bool padded)
 {
     MarkerList list;
@@ -49,7 +49,7 @@ std::optional<MarkerList> MarkerList::read(BytesView body)
     MarkerList padded = markersOf(reader, count, true);
     if (padded.missingMarkers == 0)
         return padded;
-    // Writers that leave pad bytes out fill the chunk to its last byte so.
+    // A writer that omits pad bytes fills the chunk to its last byte with markers that are not padded.
     MarkerList unpadded = markersOf(reader, count, false);
     return unpadded.missingMarkers == 0 && unpadded.behind.size() <= 1 ? unpadded : padded;
 }

@@ -12,7 +12,7 @@ std::optional<SamplerChunk> SamplerChunk::read(BytesView body, std::endian order
     static_cast<SamplerFields&>(chunk) = *fields;
     chunk.loops = takeRecords<SamplerLoop>(reader, loopCount, order);
     chunk.missingLoops = loopCount - static_cast<std::uint32_t>(chunk.loops.size());
-    // Half a loop is no data of the maker.
+    // Half a loop is not data of the manufacturer.
     if (chunk.missingLoops == 0) {
         const BytesView data = reader.take(std::min<std::size_t>(dataSize, reader.remaining()));
         chunk.samplerData.assign(data.begin(), data.end());

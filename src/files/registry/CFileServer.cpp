@@ -156,7 +156,7 @@ const std::vector<TFileInfo>& CFileServer::GetFileInfoVector(unsigned int client
     return fileInfos_;
 }
 
-/// Kept: a stereo file that is held as mono has other channels than any file, and is never the one.
+/// Kept: a stereo file that is held as mono differs in its channels from every file, so it never matches.
 TContainer* CFileServer::FindReplaced(const CFileRef& newFile, const char* name) const
 {
     if (newFile.HasExtension(kUnloadedExtension))
@@ -183,9 +183,9 @@ std::vector<unsigned int> CFileServer::UpdateAudioFileInfo(const CFileRef* newFi
     TContainer* container = isNew && newFile->GetFileName(name, nameSize) ? FindReplaced(*newFile, name) : nullptr;
     if (container == nullptr)
         return {};
-    const CFileRef replacement = *newFile; // the caller may pass one reference as both
+    const CFileRef replacement = *newFile; // the caller may pass the same reference for both
     if (const TContainer* holder = Find(&replacement); holder != nullptr && holder != container)
-        return {}; // others read that one's samples
+        return {}; // other clients read its samples
     oldFile = container->ref;
     kTContainerValueCallbacks.retain(container);
     files_.remove(oldFile.URL());

@@ -4,7 +4,7 @@
 
 FileTable::FileTable(std::size_t capacity, const TContainerValueCallbacks& callbacks) : callbacks_(callbacks)
 {
-    constexpr std::size_t reserved = 4096; // a limit of a million files is no million files
+    constexpr std::size_t reserved = 4096; // a limit of a million files does not mean a million files
     byURL_.reserve(std::min(capacity, reserved));
 }
 

@@ -10,10 +10,10 @@ namespace {
 
 constexpr std::uint64_t kBlockFrames = 16 * 1024;
 
-/// Null when there is no such memory. Pages that are not written to cost nothing.
+/// Null if that much memory cannot be had. Pages that are never written cost nothing.
 SampleArray allocate(std::uint64_t samples)
 {
-    constexpr std::uint64_t alwaysThere = 64 << 20; // asking costs more than reading a short file
+    constexpr std::uint64_t alwaysThere = 64 << 20; // asking first costs more than reading a short file
     std::uint64_t bytes = 0;
     if (__builtin_mul_overflow(samples, sizeof(float), &bytes) || bytes > std::numeric_limits<std::size_t>::max() / 2 ||
         (bytes > alwaysThere && bytes > platform::availableMemory()))
@@ -34,27 +34,28 @@ bool channelsAreEqual(const float* stereo, std::uint64_t frames)
     return true;
 }
 
-/// Within one array: the left samples of `frames` frames close up.
+/// Moves the left samples of `frames` frames together, within the array.
 void keepLeft(float* samples, std::uint64_t frames)
 {
     for (std::uint64_t i = 0; i < frames; ++i)
         samples[i] = samples[2 * i];
 }
 
-/// Within one array that has room for twice the frames: back from keepLeft.
+/// The reverse of keepLeft, within an array that has room for twice the frames.
 void doubleUp(float* samples, std::uint64_t frames)
 {
     for (std::uint64_t i = frames; i-- > 0;)
         samples[2 * i] = samples[2 * i + 1] = samples[i];
 }
 
-/// Fills an array with room for stereo, mono as long as that is enough; `channels` says which it has become.
+/// Fills an array with room for stereo, with mono for as long as both channels are equal; `channels` says which it is.
 bool readStereo(CAudioFileIO& file, float* samples, std::uint64_t frames, std::uint32_t& channels)
 {
     std::uint64_t done = 0;
     while (done < frames) {
         const std::uint64_t count = std::min(kBlockFrames, frames - done);
-        float* const block = samples + done; // behind the mono samples, and within the array since they are half
+        // The block goes behind the mono samples; it fits, since they take half the room of stereo.
+        float* const block = samples + done;
         if (!read(file, block, done, count))
             return false;
         if (!channelsAreEqual(block, count)) {
@@ -70,7 +71,7 @@ bool readStereo(CAudioFileIO& file, float* samples, std::uint64_t frames, std::u
     return true;
 }
 
-/// Gives back what lies behind the first `samples` samples.
+/// Frees the memory beyond the first `samples` samples.
 void shrink(SampleArray& array, std::uint64_t samples)
 {
     if (void* shorter = std::realloc(array.get(), static_cast<std::size_t>(samples) * sizeof(float))) {
@@ -84,7 +85,7 @@ void shrink(SampleArray& array, std::uint64_t samples)
 bool LoadSamples(CAudioFileIO& file, LoadedSamples& loaded)
 {
     const AudioFileInfo& info = file.Info();
-    if (file.OpenDecoder() != kStatusOK) // of compressed data, it knows best how much there is
+    if (file.OpenDecoder() != kStatusOK) // the decoder of compressed data knows its length best
         return false;
     if (info.frames <= 0 || info.frames > std::numeric_limits<std::uint32_t>::max() || info.channels <= 0 ||
         info.sampleRate <= 0)

@@ -111,7 +111,7 @@ std::span<const float> AudioRepresentation::samples(int channel) const
     return channel >= 0 && index < samples_.size() ? std::span<const float>(samples_[index]) : std::span<const float>();
 }
 
-/// One channel is handed over, of several each is copied out.
+/// Moves the samples of one channel; copies those of several out, channel by channel.
 void AudioRepresentation::setSamples(std::vector<float> interleaved, int channels)
 {
     channels_ = channels;

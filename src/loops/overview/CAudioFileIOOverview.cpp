@@ -1,4 +1,4 @@
-// The overview of a file: read in pieces, as its samples are stored.
+// The overview of a file, made of its samples piece by piece, as they are stored.
 #include "audiofile/CAudioFileIO.h"
 #include "loops/overview/MDOverview.h"
 
@@ -7,23 +7,23 @@
 
 namespace {
 
-constexpr long kPieceSize = 128 * 1024; // stays in the processor's cache between the read and the fold
+constexpr long kPieceSize = 128 * 1024; // stays in the processor's cache between reading and folding
 constexpr long long kPiecesPerProgress = 32;
 
-/// Of frames as they are read: linear PCM as it is stored, other samples as floats from the decoder.
+/// Bytes per frame as it is read: linear PCM as it is stored, other samples as floats from the decoder.
 long frameSizeOf(const AudioFileInfo& info)
 {
     return info.compressed ? info.channels * long{sizeof(float)} : info.bytesPerFrame;
 }
 
-// Whole points where a piece holds one.
+// A whole number of points if a piece holds at least one.
 long framesPerPiece(const AudioFileInfo& info)
 {
     const long frames = std::max(kPieceSize / frameSizeOf(info), 1L);
     return frames < kOverviewFramesPerPoint ? frames : frames - frames % kOverviewFramesPerPoint;
 }
 
-/// Sets `frames` to fewer where compressed data ends ahead of what its file promises.
+/// Reduces `frames` if compressed data ends before the length that its file promises.
 std::int32_t readPiece(CAudioFileIO& file, std::byte* piece, long long frame, long& frames)
 {
     const AudioFileInfo& info = file.Info();

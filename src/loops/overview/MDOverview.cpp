@@ -13,7 +13,7 @@ constexpr int kHighest = 127;
 constexpr long kPointFrames = kOverviewFramesPerPoint;
 constexpr platform::SampleFormat kOwnFloats{32, true, false, std::endian::native};
 
-// Lowest and highest so far, zero included; not clamped yet.
+// The lowest and highest value so far, zero included, before clamping.
 struct Extremes {
     int lowest = 0;
     int highest = 0;
@@ -36,8 +36,8 @@ Extremes extremesOfBytes(const std::int8_t* samples, long frames, int channels, 
     return extremes;
 }
 
-// The extremes of samples in any format. Rounding keeps the order of samples, so that of a point only the extremes are
-// rounded; whole points, which follow each other, are done in batches.
+// The extremes of samples in any format. Rounding preserves order, so only the extremes of a point are rounded;
+// consecutive whole points are computed in batches.
 class StoredSamples {
 public:
     StoredSamples(const void* samples, platform::SampleFormat format, long frames, int channels)
@@ -154,7 +154,7 @@ void MDOverview::Add(const float* samples, long start, long frames, int channels
 {
     if (channels < 1 || channels > kMostChannels)
         return;
-    // Kept: slices, which tell where frames beyond the block's end cease to be counted.
+    // Kept: slices decide where frames beyond the block's end stop counting.
     const long slice = kMostChannels / channels;
     for (long done = 0; done < frames; done += slice)
         AddStored(samples + std::ptrdiff_t{done} * channels, kOwnFloats, start + done, std::min(slice, frames - done),
@@ -189,7 +189,7 @@ void MDOverview::AddRough(const float* samples, long frames)
         const long part = std::min(frames - done, missing);
         float highest = 0;
         for (long i = done; i < done + part; ++i)
-            highest = samples[i] > highest ? samples[i] : highest; // a NaN is passed over
+            highest = samples[i] > highest ? samples[i] : highest; // passes over a NaN
         const auto peak = static_cast<std::int8_t>(std::min(highest * kHighest, static_cast<float>(kHighest)));
         roughPeak_ = std::max(roughPeak_, peak);
         if (roughPeak_ > points[point].maximum)

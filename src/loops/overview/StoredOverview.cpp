@@ -26,7 +26,7 @@ struct Body {
     std::int64_t size = 0;
 };
 
-/// 1 found, 0 not found, or an error; one for a body that is not all in the file, too.
+/// 1 if found, 0 if not, or an error, which also stands for a body that the file does not hold whole.
 std::int32_t findBody(CAudioFileIO& file, FourCC id, Body& body)
 {
     ChunkEntry chunk;
@@ -37,7 +37,7 @@ std::int32_t findBody(CAudioFileIO& file, FourCC id, Body& body)
     return result;
 }
 
-/// The words of the header from the container's order to the host's, or back.
+/// Converts the header's words from the container's byte order to the host's, or back.
 void swapHeader(KTMem& block)
 {
     OverviewHeader header;
@@ -74,14 +74,15 @@ std::int32_t countCAFOverviews(CAudioFileIO& file, int& count)
     });
 }
 
-/// Removing takes out the first only, and the first is the one that is found: the last `kept` stay.
+/// Removes overviews until the last `kept` remain. Removing takes the first one, which is also the one that readers
+/// find.
 std::int32_t removeCAFOverviews(CAudioFileIO& file, int kept)
 {
     for (int before = -1;;) {
         int count = 0;
         if (const std::int32_t status = countCAFOverviews(file, count); status != kStatusOK || count <= kept)
             return status;
-        if (count == before) // it cannot be removed
+        if (count == before) // the chunk cannot be removed
             return kStatusIOError;
         before = count;
         if (const std::int32_t status = file.RemoveChunk(kCAFOverview); status != kStatusOK)
@@ -89,7 +90,7 @@ std::int32_t removeCAFOverviews(CAudioFileIO& file, int kept)
     }
 }
 
-/// Nothing is left of an addition that failed: it would be in the way of the next.
+/// Appends the chunk, and cuts a failed addition off again: its remains would stand in the way of the next one.
 std::int32_t addCAFOverview(CAudioFileIO& file, const KTMem& chunk)
 {
     const long long end = file.GetEOF();
@@ -104,8 +105,8 @@ std::int32_t writeCAF(CAudioFileIO& file, const KTMem& overview, bool& stored)
 {
     Body data;
     Packed<std::uint32_t> editCount;
-    // One that is open-ended, of size -1, is not found, and one that goes beyond the end of the file is an error: what
-    // is put behind them would be samples.
+    // Samples that are open-ended (size -1) are "not found", and samples that run past the end of the file are an
+    // error: a chunk put behind either would become part of the sound.
     if (findBody(file, kData, data) != kFound || data.size < std::int64_t{sizeof editCount})
         return kStatusParameterError;
     if (const std::int32_t status = file.Read(&editCount, data.offset, sizeof editCount, nullptr); status != kStatusOK)
@@ -122,9 +123,11 @@ std::int32_t writeCAF(CAudioFileIO& file, const KTMem& overview, bool& stored)
     if (const std::int32_t status = file.PrepareToAppend(); status != kStatusOK)
         return status;
     if (const std::int32_t status = addCAFOverview(file, chunk);
-        status != kStatusOK) // the old one goes when this stands
+        // The new overview is complete before the old one goes: until then a file that is cut short has the old one
+        // first, which is the one that readers find, and perhaps part of a chunk at its end.
+        status != kStatusOK)
         return status;
-    const std::int32_t removed = removeCAFOverviews(file, 1); // until then the old one is the one that is found
+    const std::int32_t removed = removeCAFOverviews(file, 1); // the old one goes last, having been found until now
     stored = removed == kStatusOK;
     return removed;
 }
@@ -140,14 +143,14 @@ std::int32_t writeChunked(CAudioFileIO& file, KTMem& overview, bool& stored)
     if (swaps)
         swapHeader(overview);
     stored = added == kFound;
-    if (added == kNotFound) // no chunked container after all
+    if (added == kNotFound) // the file is no chunked container after all
         return kStatusParameterError;
     return stored ? kStatusOK : added;
 }
 
 // ---- reading
 
-/// A file of compressed samples may claim any number of frames: what would not fit into the file many times over is not
+/// A file of compressed samples may claim any number of frames; an overview many times larger than the file is not
 /// allocated.
 bool isPlausible(const CAudioFileIO& file, std::int64_t frames)
 {
@@ -186,7 +189,7 @@ std::int32_t readCAF(CAudioFileIO& file, std::int64_t frames, KTMem& block)
         return status;
     const auto framesPerPair =
         static_cast<std::int32_t>(inByteOrder(std::uint32_t{header.framesPerSample}, std::endian::big));
-    if (framesPerPair < 1) // 2^31 and more are no number of frames either
+    if (framesPerPair < 1) // also excludes 2^31 and more
         return kStatusParameterError;
     if (!block.allocate(OverviewBlockSize(frames)))
         return kStatusOutOfMemory;
@@ -215,7 +218,8 @@ std::int32_t readPlain(CAudioFileIO& file, std::int64_t frames, KTMem& block)
     return IsOverviewBlock(block) ? kFound : kStatusParameterError;
 }
 
-/// The prefix and the header of an older overview are not interpreted: the file says how many frames it has.
+/// Reads the points of an older overview. Its prefix and header are not interpreted, since the file says how many
+/// frames it has.
 std::int32_t readOlder(CAudioFileIO& file, std::int64_t frames, KTMem& block)
 {
     Body body;
@@ -238,7 +242,7 @@ std::int32_t readOlder(CAudioFileIO& file, std::int64_t frames, KTMem& block)
     return kFound;
 }
 
-/// 1 read, 0 none stored, or an error.
+/// 1 if read, 0 if none is stored, or an error.
 std::int32_t readOverview(CAudioFileIO& file, std::int64_t frames, KTMem& block)
 {
     if (!isAccepted(file.Info()))
@@ -248,7 +252,7 @@ std::int32_t readOverview(CAudioFileIO& file, std::int64_t frames, KTMem& block)
     const std::int32_t result = readPlain(file, frames, block);
     if (result != kNotFound && result != kStatusParameterError)
         return result;
-    // One that does not fit does not hide an older one that does.
+    // An overview that does not fit must not hide an older one that does.
     const std::int32_t older = readOlder(file, frames, block);
     return older == kNotFound ? result : older;
 }

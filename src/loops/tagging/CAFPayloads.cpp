@@ -10,7 +10,7 @@
 
 namespace {
 
-/// Runs a builder on an empty writer; null when memory is short.
+/// Runs a builder on an empty writer; null if memory is short.
 template <class Build>
 std::optional<Bytes> built(Build build)
 try {

@@ -11,14 +11,14 @@ namespace platform {
 
 namespace {
 
-/// Whether data are blocks of ADPCM as they should be, the last one too: of others it is the decoder that says how many
-/// frames they hold.
+/// Whether the data consists of well-formed ADPCM blocks, including the last. Otherwise only the decoder can tell how
+/// many frames there are.
 bool areWholeBlocks(const StoredFormat& format, std::uint64_t dataSize)
 {
     constexpr FourCC microsoft = fourCC('m', 's', 0, 2);
     const StreamDescription& stream = format.stream;
     const std::uint64_t channels = stream.channelsPerFrame, bytes = stream.bytesPerPacket;
-    // A block begins with a few bytes for each channel, which hold one frame, or two.
+    // A block begins with a few bytes per channel, which hold one frame or two.
     const std::uint64_t headerSize = (format.coding == microsoft ? 7 : 4) * channels;
     const std::uint64_t inHeader = format.coding == microsoft ? 2 : 1;
     return channels > 0 && bytes > headerSize && dataSize % bytes == 0 && stream.bitsPerChannel == 4 &&
@@ -42,7 +42,7 @@ bool AudioDescriber::isLikeWAVE() const
 void AudioDescriber::meet(const WalkedChunk& chunk)
 {
     const ContainerTraits& traits = *container_.traits;
-    if (traits.readFormat == nullptr) // of its sound nothing is known
+    if (traits.readFormat == nullptr) // nothing is known about its sound
         return;
     if (chunk.id == traits.formatId && !metFormat_)
         readFormat(chunk);
@@ -58,7 +58,7 @@ void AudioDescriber::meet(const WalkedChunk& chunk)
         readLayout(chunk);
 }
 
-/// A packet table may stand behind the data that it tells of.
+/// A packet table may stand behind the data that it describes.
 bool AudioDescriber::isComplete() const
 {
     return metFormat_ && found_.hasSound &&
@@ -77,11 +77,11 @@ void AudioDescriber::readFormat(const WalkedChunk& chunk)
 
 void AudioDescriber::locateSound(const WalkedChunk& chunk)
 {
-    constexpr std::uint64_t editCountSize = 4; // of CAF
+    constexpr std::uint64_t editCountSize = 4; // CAF's edit count
     constexpr std::int64_t toTheEnd = INT64_MAX;
     const auto size = static_cast<std::uint64_t>(chunk.size);
     const std::uint64_t there = std::min(size, window_.length() - chunk.body);
-    std::uint64_t lead = 0; // ahead of the samples, in the body
+    std::uint64_t lead = 0; // bytes in the body ahead of the samples
     if (container_.traits->kind == ContainerKind::caf)
         lead = std::min(editCountSize, there);
     if (container_.traits->kind == ContainerKind::iff) {
@@ -106,7 +106,7 @@ void AudioDescriber::readPacketTable(const WalkedChunk& chunk)
     packetTable_->frames = reader.read<std::int64_t>();
 }
 
-/// Only a bitmap tells the order of the channels, too.
+/// Only a bitmap also tells the order of the channels.
 void AudioDescriber::readLayout(const WalkedChunk& chunk)
 {
     constexpr std::uint32_t byBitmap = 0x10000;
@@ -147,15 +147,16 @@ void AudioDescriber::count(AudioDescription& description) const
         description.packetCount = counted;
 
     if (stream.isLinearPCM()) {
-        // Of AIFF what the file counts, where that is there; a count of 0 with samples behind it was never filled in.
+        // AIFF counts its frames, of which those are used that are present; a count of 0 despite samples was never
+        // filled in.
         if (counted > 0)
             description.packetCount = std::min(counted, there);
         description.frames = description.packetCount;
     } else if (container_.traits->kind == ContainerKind::caf) {
         countPacketsOfCAF(description);
     } else if (container_.traits->kind == ContainerKind::iff) {
-        // Packets of one size are those that are there: some writers count frames, or the packets of all channels as
-        // one.
+        // Packets of one size are counted from the data: some writers state frames instead, or the packets of all
+        // channels together.
         description.framesAreStated = stream.bytesPerPacket == 0;
         description.frames = description.framesAreStated ? counted : there * stream.framesPerPacket;
     } else {
@@ -163,8 +164,9 @@ void AudioDescriber::count(AudioDescription& description) const
     }
 }
 
-/// Frames of compressed data in WAVE and its kin. A "fact" is believed when its frames need the blocks that are there,
-/// where their size is known: some writers count the frames of IMA ADPCM once for all channels.
+/// Counts the frames of compressed data in WAVE and its kin. If the size of the blocks is known, a "fact" is trusted
+/// only if its frames need all blocks that are present: some writers count the frames of IMA ADPCM once for all
+/// channels.
 void AudioDescriber::countBlocks(AudioDescription& description) const
 {
     const StreamDescription& stream = description.stream();
@@ -176,7 +178,8 @@ void AudioDescriber::countBlocks(AudioDescription& description) const
     const std::uint64_t said = isLong ? std::uint64_t{header.sampleCount} : factFrames_.value_or(0);
     description.framesAreStated = inBlocks == 0 || description.missingDataSize > 0 ||
                                   (framesPerBlock > 1 && !areWholeBlocks(*description.format, description.dataSize));
-    if (description.framesAreStated) { // no more than the blocks can hold, the one that is cut short too
+    // At most what the blocks can hold, including one that is cut short.
+    if (description.framesAreStated) {
         const std::uint64_t most =
             framesPerBlock > 0 && stream.bytesPerPacket > 0 ? inBlocks + framesPerBlock : INT64_MAX;
         description.frames = factFrames_ ? std::min(said, most) : inBlocks;
@@ -185,7 +188,7 @@ void AudioDescriber::countBlocks(AudioDescription& description) const
     description.frames = said + framesPerBlock > inBlocks && said < inBlocks ? said : inBlocks;
 }
 
-/// No more frames than the packets hold that can be there, each of a byte at least.
+/// At most the frames of as many packets as can be present, each of at least one byte.
 void AudioDescriber::countPacketsOfCAF(AudioDescription& description) const
 {
     const StreamDescription& stream = description.stream();

@@ -5,9 +5,9 @@
 
 namespace platform {
 
-/// The speakers that a layout's channels feed, as bits of the channel mask of extensible WAVE, whatever the channels'
-/// order; `bitmap` counts with the tag that says so. 0 of a layout that is not one of speakers, as "binaural", or whose
-/// channels are described one by one.
+/// The speakers of a layout's channels, as bits of extensible WAVE's channel mask, whatever the channels' order.
+/// `bitmap` counts only with the tag that refers to it. 0 for layouts that are no speakers, such as "binaural", and for
+/// channels that are described one by one.
 std::uint32_t speakersOfLayout(std::uint32_t tag, std::uint32_t bitmap);
 
 } // namespace platform

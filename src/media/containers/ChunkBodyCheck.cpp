@@ -48,7 +48,7 @@ void BodyCheck::check(const WalkedChunk& chunk)
         checkList(chunk);
 }
 
-/// The sizes of further chunks, behind those that every "ds64" has.
+/// Checks the sizes of further chunks, which follow those that every "ds64" has.
 void BodyCheck::checkTable(const WalkedChunk& chunk)
 {
     constexpr std::uint64_t fixedSize = 28, entrySize = 12;
@@ -64,13 +64,13 @@ void BodyCheck::checkTable(const WalkedChunk& chunk)
               .found = room});
 }
 
-/// The chunks in a chunk: the first that does not fit ends it, as it does for readers.
+/// Checks the chunks inside a chunk. The first that does not fit ends the check, as it ends reading.
 void BodyCheck::checkList(const WalkedChunk& chunk)
 {
     const std::uint64_t end = chunk.body + static_cast<std::uint64_t>(chunk.size);
     for (std::uint64_t at = chunk.body + sizeof(FourCC); at + sizeof(ChkHeader) <= end;) {
         const std::byte* const header = window_.at(at, sizeof(ChkHeader));
-        if (header == nullptr || loadBE<FourCC>(header) == 0) // room behind the last
+        if (header == nullptr || loadBE<FourCC>(header) == 0) // padding behind the last item
             return;
         const auto id = loadBE<FourCC>(header);
         const std::uint64_t size = load<std::uint32_t>(header + sizeof(FourCC), traits_.order);
@@ -89,7 +89,7 @@ void BodyCheck::checkList(const WalkedChunk& chunk)
     }
 }
 
-/// Samples may begin behind the first of their chunk, but not behind the last.
+/// Samples may begin after the start of their chunk's body, but not after its end.
 void BodyCheck::checkOffset(const WalkedChunk& chunk)
 {
     constexpr std::uint64_t fixedSize = 8;

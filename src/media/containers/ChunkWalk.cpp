@@ -11,12 +11,12 @@ namespace platform {
 
 namespace {
 
-constexpr std::uint32_t kSizeElsewhere = 0xFFFFFFFF; // in the "ds64", or open
+constexpr std::uint32_t kSizeElsewhere = 0xFFFFFFFF; // the size stands in the "ds64", or is open
 constexpr std::int64_t kToTheEnd = INT64_MAX;
 constexpr std::uint64_t kAUHeaderSize = 24;
-constexpr std::int64_t kAheadOfSize = 8; // the size of a container counts from here
+constexpr std::int64_t kAheadOfSize = 8; // the container's size counts from here
 
-/// Some writers leave out the pad byte behind an odd size: what follows is one only when it is zero.
+/// Some writers omit the pad byte after an odd size, so a byte counts as padding only if it is zero.
 bool isPad(HeaderWindow& window, std::uint64_t position)
 {
     const std::byte* byte = window.at(position, 1);
@@ -122,7 +122,7 @@ std::int32_t ChunkWalk::beginChunked()
         const std::int32_t status = readContainerHeader(window_, container_.header);
         if (status != kStatusOK && (policy_ == WalkPolicy::asStated || status != kStatusEndOfFile))
             return status;
-        if (status != kStatusOK) { // too short for a first chunk with sizes
+        if (status != kStatusOK) { // too short for a first chunk that holds sizes
             container_.header = {};
             container_.header.id = container_.id;
             container_.header.size = field;
@@ -164,7 +164,7 @@ bool ChunkWalk::nextBySteps()
     const std::int64_t position = following_;
     if (error == kStatusOK)
         following_ = nextChunkHeader(window_, container_.header, position, current, ahead_, error);
-    // A parameter error is that of zeros, and of a size that leads to ahead of the file.
+    // A parameter error means zeros, or a size that leads to before the file.
     if (error != kStatusOK && error != kStatusEndOfFile && error != kStatusParameterError) {
         status_ = error;
         return false;
@@ -199,7 +199,7 @@ bool ChunkWalk::nextAsStated()
     return true;
 }
 
-/// Null when it is not there.
+/// Null if the file does not hold all of it.
 const std::byte* ChunkWalk::readHeader(std::uint64_t position)
 {
     const std::size_t size = container_.traits->chunkHeaderSize;
@@ -209,13 +209,14 @@ const std::byte* ChunkWalk::readHeader(std::uint64_t position)
     return header;
 }
 
-/// That of the header; negative where it cannot be.
+/// The size in the header; negative if it is impossible.
 std::int64_t ChunkWalk::statedSize(const std::byte* header)
 {
     switch (container_.traits->kind) {
     case ContainerKind::caf:
         return loadBE<std::int64_t>(header + 4);
-    case ContainerKind::wave64: { // counts its header
+    // Its sizes include the header.
+    case ContainerKind::wave64: {
         const std::int64_t extent = atMost63Bits(loadLE<std::uint64_t>(header + 16));
         return extent == kToTheEnd ? kToTheEnd : extent - container_.traits->chunkHeaderSize;
     }
@@ -226,10 +227,10 @@ std::int64_t ChunkWalk::statedSize(const std::byte* header)
     if (container_.traits->kind != ContainerKind::riff)
         return chunk_.field;
     const std::int64_t size = ChkHeader{chunk_.id, chunk_.field}.EffectiveSize(container_.header);
-    return size < 0 ? kToTheEnd : size; // of a "ds64", beyond all that is
+    return size < 0 ? kToTheEnd : size; // a size from a "ds64" that is larger than any file
 }
 
-/// Where the chunk behind one that ends at `end` stands.
+/// The position of the chunk after one that ends at `end`.
 std::uint64_t ChunkWalk::padded(std::uint64_t end)
 {
     const std::uint64_t pad = container_.traits->padOf(end - chunk_.body);
@@ -237,7 +238,7 @@ std::uint64_t ChunkWalk::padded(std::uint64_t end)
     return padIsMissing_ ? end : end + pad;
 }
 
-/// Goes behind the chunk, which ends with the file at the latest.
+/// Moves past the chunk, which ends with the file at the latest.
 void ChunkWalk::pass()
 {
     const auto size = static_cast<std::uint64_t>(chunk_.size);
@@ -258,7 +259,7 @@ bool ChunkWalk::nextToTheSound()
         return false;
     isBroken_ = isBroken_ || behindHeader > limit_; // the container is longer than it says
     const std::byte* header = readHeader(end_);
-    if (header == nullptr) { // the file became shorter meanwhile, or cannot be read
+    if (header == nullptr) { // the file was cut meanwhile, or cannot be read
         status_ = window_.failure();
         return endAsBroken();
     }
@@ -267,7 +268,7 @@ bool ChunkWalk::nextToTheSound()
     if (isSound)
         size = sizeOfSound(size);
     const std::uint64_t there = window_.length() - chunk_.body;
-    // Zeros are no chunk, nor is what would be zeros with a size that is put right.
+    // Zeros are no chunk, and neither is an id of zero whose size would be corrected.
     if (size < 0 || (chunk_.id == 0 && (size == 0 || there == 0)))
         return endAsBroken();
     chunk_.size = size;
@@ -282,8 +283,8 @@ bool ChunkWalk::endAsBroken()
     return false;
 }
 
-/// Those of an unfinished recording go on to the end of the file. Nothing is put behind samples that a size of none
-/// hides: whoever goes by the sizes would not find the way to it.
+/// The size of the samples; in an unfinished recording they extend to the end of the file. The walk counts as broken if
+/// an empty size hides samples, because a reader that goes by sizes would not find a chunk put behind them.
 std::int64_t ChunkWalk::sizeOfSound(std::int64_t stated)
 {
     const ContainerKind kind = container_.traits->kind;
@@ -295,8 +296,8 @@ std::int64_t ChunkWalk::sizeOfSound(std::int64_t stated)
         sound.isOpen = stated == kToTheEnd;
         sound.size = std::max<std::int64_t>(stated, 0);
     }
-    // Samples of a CAF file of which none is there would have a size of 0 if anything followed them, which makes them
-    // unfinished: what followed would be taken for sound.
+    // An empty sound chunk at the end of a CAF file becomes unfinished as soon as anything follows it, and what follows
+    // would be taken for sound.
     if (kind == ContainerKind::caf && there == 0)
         isBroken_ = true;
     if (!isUnfinished(kind, sound) || static_cast<std::uint64_t>(sound.size) == there)
@@ -305,7 +306,7 @@ std::int64_t ChunkWalk::sizeOfSound(std::int64_t stated)
     return kToTheEnd;
 }
 
-/// The header, then the samples.
+/// First the header, then the samples.
 bool ChunkWalk::nextOfAU()
 {
     if (!hasBegun_) {

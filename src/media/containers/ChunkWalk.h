@@ -1,6 +1,5 @@
-// The one walk through the chunks of a container, by whatever it is read. Whoever lists, finds, adds, removes or
-// describes goes this way, so that damaged files are read one way; where two callers must differ, that is a policy
-// here.
+// The only walk through the chunks of a container. Whoever lists, finds, adds, removes or describes chunks uses it, so
+// that all read damaged files alike; where two callers must differ, the difference is a policy here.
 #pragma once
 
 #include "media/containers/ContainerHeaders.h"
@@ -11,37 +10,37 @@
 
 namespace platform {
 
-/// How far a walk goes, and what it makes of sizes that cannot be.
+/// How far a walk goes, and how it treats impossible sizes.
 enum class WalkPolicy : std::uint8_t {
-    /// To the samples and on, as who plays a file wants it. A container size that was never filled in means the end of
-    /// the file, and format and samples are looked for beyond what it says, as there are readers that never look at it.
-    /// Sizes are unsigned; samples of an unfinished recording go on to the end of the file (isUnfinished). Zeros are no
-    /// chunk.
+    /// For playing: walks to the samples and on. A container size that was never filled in means the end of the file,
+    /// and format and samples are searched for beyond the stated end, since some readers never look at it. Sizes are
+    /// unsigned; samples of an unfinished recording extend to the end of the file (isUnfinished). Zeros are no chunk.
     toTheSound,
-    /// By the sizes as they stand, as the edits of the container class want it: new chunks go where the container says
-    /// that it ends. Kept: a size of 0 ends it at its first chunk, sizes of FORM are signed and negative ones end the
-    /// walk, bytes behind the last chunk that are too few for another belong to it, and zeros are a chunk, behind which
-    /// only CAF goes on.
+    /// For edits of the container class: takes the sizes as they stand, because new chunks go where the container says
+    /// that it ends. Kept: a size of 0 ends the container at its first chunk; sizes in FORM are signed, and a negative
+    /// one ends the walk; bytes after the last chunk that are too few for another belong to it; zeros are a chunk,
+    /// after which only CAF continues.
     asStated
 };
 
-/// A container as its first bytes show it.
+/// A container as its first bytes describe it.
 struct Container {
     const ContainerTraits* traits = nullptr;
     FourCC id = 0;       // the first four bytes
     FourCC formType = 0; // of RIFF, RIFX, FORM and "CAT "
-    /// Of RIFF, FORM and "CAT ", in host order.
+    /// For RIFF, FORM and "CAT ", in host order.
     ContainerChkExtended header{};
 };
 
 /// A chunk as the walk meets it.
 struct WalkedChunk {
     FourCC id = 0;
-    std::uint32_t field = 0;    // the size as it stands in an 8-byte header
+    std::uint32_t field = 0;    // as it stands in an 8-byte header
     std::uint64_t position = 0; // of the header
     std::uint64_t body = 0;
-    /// Of the body, in force: of the header, or of the "ds64". It may go beyond the end of the file; to the sound it is
-    /// INT64_MAX for samples that go on to the end of the file, as stated it may be negative.
+    /// Effective size of the body, from the header or the "ds64". It may extend beyond the end of the file. Walking to
+    /// the sound, it is INT64_MAX for samples that extend to the end of the file; walking as stated, it may be
+    /// negative.
     std::int64_t size = 0;
 
     bool hasItsBytes(std::uint64_t fileLength) const
@@ -50,43 +49,41 @@ struct WalkedChunk {
     }
 };
 
-/// Does not own the window. Costs a call for each part of the file that the window does not hold, and no memory.
+/// Does not own the window. Costs one call for each part of the file that the window does not hold, and no memory.
 class ChunkWalk {
 public:
     ChunkWalk(HeaderWindow& window, WalkPolicy policy) : window_(window), policy_(policy) {}
 
-    /// Reads the start. 0; kStatusParameterError for a file that is none of the containers; kStatusEndOfFile for one
-    /// that ends in its header; the status of a read that failed.
+    /// Reads the start. kStatusParameterError if the file is no known container; kStatusEndOfFile if it ends inside its
+    /// header; the status of a failed read; else 0.
     std::int32_t begin();
-    /// Begins without reading, as stated, in WAVE whose header stands in memory and may no longer stand in the file.
+    /// Begins as stated, without reading, in WAVE whose header is in memory and may no longer be in the file.
     void beginAs(const ContainerChkExtended& header);
     const Container& container() const { return container_; }
-    /// Where the chunks end by what the container states, at most the length of the file. Negative where a signed size
-    /// is.
+    /// Where the chunks end according to the container, at most the length of the file. Negative if a signed size is.
     std::int64_t statedEnd() const { return statedEnd_; }
 
-    /// Goes to the next chunk; false when there is none, and when a header, by which it is found, cannot be read:
-    /// then nobody knows either where the one ahead ends, which is not shown.
+    /// Moves to the next chunk. False if there is none, and if a header cannot be read. The chunk before that header is
+    /// not shown either, because its end depends on it.
     bool next();
     const WalkedChunk& chunk() const { return chunk_; }
-    /// Of the read that ended the walk; else kStatusOK.
+    /// Status of the read that ended the walk; else kStatusOK.
     std::int32_t status() const { return status_; }
 
-    // As stated.
+    // For walks as stated.
 
-    /// Of what follows the chunk; the length of the file when nothing does, and behind a size that cannot be.
+    /// Position of what follows the chunk; the length of the file if nothing does, and after an impossible size.
     std::int64_t following() const { return following_; }
 
-    // To the sound.
+    // For walks to the sound.
 
-    /// Behind the last chunk, where one more would stand.
+    /// Where one more chunk would go, after the last.
     std::uint64_t end() const { return end_; }
-    /// The walk met bytes that are no chunk, or samples that hide what follows them: nothing may be put behind the last
-    /// one.
+    /// The walk met bytes that are no chunk, or samples that hide what follows them, so nothing may be appended.
     bool isBroken() const { return isBroken_; }
-    /// The first chunk of samples was among those that were met.
+    /// The walk has met the first chunk of samples.
     bool metSound() const { return metSound_; }
-    /// Of the last chunk: odd, and its writer left the pad byte out.
+    /// The last chunk has an odd size and no pad byte.
     bool padIsMissing() const { return padIsMissing_; }
 
 private:
@@ -114,23 +111,23 @@ private:
     std::int32_t status_ = 0;
     Container container_;
     WalkedChunk chunk_;
-    ChkHeader ahead_;                // as stated: that of `following_`, in host order
-    std::int64_t containerSize_ = 0; // from offset 8 on; to the sound 0 where that is open
+    ChkHeader ahead_;                // as stated: the header at `following_`, in host order
+    std::int64_t containerSize_ = 0; // from offset 8 on; to the sound 0 if it is open
     std::int64_t statedEnd_ = 0;
     std::int64_t following_ = 0;
-    std::uint64_t limit_ = 0; // to the sound: that of the container
+    std::uint64_t limit_ = 0; // to the sound: end of the container
     std::uint64_t end_ = 0;
 };
 
-/// The header of a RIFF or FORM container, in host order; the record is cleared first. 0, kStatusEndOfFile, or the
-/// status of the read that failed.
+/// Reads the header of a RIFF or FORM container in host order, after clearing the record. 0, kStatusEndOfFile, or the
+/// status of a failed read.
 std::int32_t readContainerHeader(HeaderWindow& window, ContainerChkExtended& header);
 
-/// One step as stated, through a RIFF or FORM container: the offset of the chunk after `current`, whose header stands
-/// at `position`; `next` receives its header in host order. Position 0 asks for the first chunk. A chunk that runs past
-/// the end of the file, a negative size and a failed read give the file's length; the walk is over when the result does
-/// not exceed `position`, or reaches the container's end. `error` is the status of reading the header:
-/// kStatusParameterError when `current` is all zero. `next` is zero when it could not be read.
+/// One step, as stated, through a RIFF or FORM container: returns the offset of the chunk after `current`, whose header
+/// is at `position`, and puts its header into `next` in host order (zero if it could not be read). Position 0 asks for
+/// the first chunk. Returns the file's length for a chunk that runs past the end of the file, for a negative size and
+/// for a failed read; the walk is over once the result does not exceed `position` or reaches the container's end.
+/// `error` is the status of reading the header: kStatusParameterError if `current` is all zero.
 std::int64_t nextChunkHeader(HeaderWindow& window, const ContainerChkExtended& header, std::int64_t position,
                              const ChkHeader& current, ChkHeader& next, std::int32_t& error);
 

@@ -44,8 +44,8 @@ private:
     HeaderWindow& window_;
     std::vector<ContainerFinding>& findings_;
     ChunkWalk walk_{window_, WalkPolicy::toTheSound};
-    std::optional<std::uint64_t> statedEnd_;           // none where the container's size is open, or its kind has none
-    std::unordered_map<FourCC, std::uint64_t> places_; // of the first chunk of each id that may stand once
+    std::optional<std::uint64_t> statedEnd_;           // none if the container's size is open or its kind has none
+    std::unordered_map<FourCC, std::uint64_t> places_; // first position of each id that may occur only once
     std::uint64_t formatAt_ = 0, soundAt_ = 0, factAt_ = 0;
     std::optional<std::uint32_t> factFrames_, byteRate_;
 };
@@ -62,7 +62,7 @@ std::int32_t Check::run()
         return status;
     AudioDescriber describer(window_, container());
     checkContainerSize();
-    bool isLost = false; // where the chunks go on
+    bool isLost = false; // nobody can tell where the chunks continue
     while (!isLost && walk_.next()) {
         const WalkedChunk chunk = walk_.chunk();
         describer.meet(chunk);
@@ -88,7 +88,7 @@ void Check::checkContainerSize()
         return;
     if ((container().id == kRF64 || container().id == kBW64) && !container().header.HasValidDs64())
         add({.kind = Kind::sizes64AreMissing, .chunk = container().id, .offset = 0});
-    std::uint64_t stated = 0; // 0 where it is open
+    std::uint64_t stated = 0; // 0 if it is open
     if (kind == ContainerKind::wave64) {
         const std::byte* size = window_.at(16, sizeof stated);
         const std::uint64_t whole = size != nullptr ? loadLE<std::uint64_t>(size) : 0;
@@ -110,7 +110,7 @@ void Check::checkContainerSize()
         add({.kind = Kind::containerIsCut, .chunk = container().id, .stated = *statedEnd_, .found = window_.length()});
 }
 
-/// Order and number of chunks.
+/// Checks order and number of chunks.
 void Check::checkPlace(const WalkedChunk& chunk)
 {
     const ContainerKind kind = traits().kind;
@@ -154,7 +154,7 @@ void Check::checkSize(const WalkedChunk& chunk)
              .stated = chunk.field,
              .found = sizes64});
     if (isSound(chunk) && chunk.size == INT64_MAX) {
-        // The rules of CAF and AU let the last chunk go to the end of the file; CAF by a size of -1 and no other.
+        // In CAF and AU the last chunk may extend to the end of the file; in CAF only with a size of -1.
         const std::byte* const field = kind == ContainerKind::caf ? window_.at(chunk.position + 4, 8) : nullptr;
         const bool isByRule = kind == ContainerKind::au || (field != nullptr && loadBE<std::int64_t>(field) == -1);
         if (!isByRule)
@@ -172,8 +172,8 @@ void Check::checkSize(const WalkedChunk& chunk)
              .found = chunk.body + size});
 }
 
-/// False where nobody can tell how the chunks go on: a byte that is not zero is taken for the start of the next one by
-/// readers that know of missing pad bytes, and for a pad byte by all others.
+/// False if nobody can tell where the chunks continue: readers that know about missing pad bytes take a byte that is
+/// not zero for the start of the next chunk, all others for a pad byte.
 bool Check::checkPad(const WalkedChunk& chunk)
 {
     if (traits().alignment != 2 || chunk.size % 2 == 0 || !chunk.hasItsBytes(window_.length()))
@@ -209,7 +209,7 @@ void Check::checkEnd()
     if (end < limit && !isFill)
         add({.kind = Kind::noChunk, .chunk = container().id, .offset = end, .found = limit - end});
     const bool isOwnPad =
-        statedEnd_ && end == length && length - *statedEnd_ == 1; // which the container does not count
+        statedEnd_ && end == length && length - *statedEnd_ == 1; // a last byte that the container does not count
     if (!statedEnd_ || *statedEnd_ >= length || isOwnPad)
         return;
     if (const std::uint64_t behind = chunksBehind(*statedEnd_); behind < length)
@@ -220,8 +220,8 @@ void Check::checkEnd()
              .found = length - behind});
 }
 
-/// Tells of the chunks that stand behind the container, as programs leave them that do not count them, and gives the
-/// end of the last. What only looks like one does not end with the file or at another.
+/// Reports chunks behind the container, which programs leave that do not update its size, and returns the end of the
+/// last. Bytes that only look like a chunk do not lead to the end of the file or to another chunk.
 std::uint64_t Check::chunksBehind(std::uint64_t position)
 {
     const std::uint64_t length = window_.length();
@@ -233,7 +233,7 @@ std::uint64_t Check::chunksBehind(std::uint64_t position)
         if (size > length - position - sizeof(ChkHeader))
             break;
         const FourCC id = loadBE<FourCC>(header);
-        if (id != traits().formatId && id != traits().soundId) // which were met: readers look for them there
+        if (id != traits().formatId && id != traits().soundId) // these were met, because readers look for them there
             add({.kind = Kind::chunkBehind, .chunk = id, .offset = position, .stated = statedEnd_.value_or(0)});
         position = std::min(position + sizeof(ChkHeader) + size + (size & 1), length);
     }
@@ -260,7 +260,7 @@ void Check::checkSound(const AudioDescription& sound)
             add({.kind = Kind::soundIsMissing, .chunk = soundId});
         return;
     }
-    if (sound.missingDataSize > 0) // of what is cut nothing agrees
+    if (sound.missingDataSize > 0) // after a cut no count agrees
         return;
     const std::uint64_t rest = isPCM ? sound.dataSize % stream.bytesPerFrame : 0;
     const bool isCounted = sound.format->countedPackets > 0; // and a pad byte may be part of the chunk
@@ -273,7 +273,7 @@ void Check::checkSound(const AudioDescription& sound)
     checkCounts(sound);
 }
 
-/// The numbers of frames that chunks beside the samples state.
+/// Checks the numbers of frames that other chunks state.
 void Check::checkCounts(const AudioDescription& sound)
 {
     const StreamDescription& stream = sound.stream();
@@ -302,7 +302,7 @@ void Check::checkCounts(const AudioDescription& sound)
              .found = there});
 }
 
-/// Which players take for the length of sound that they do not measure.
+/// Checks the byte rate, from which players compute the length of sound that they do not measure.
 void Check::checkByteRate(const StreamDescription& stream)
 {
     const auto real = static_cast<std::uint64_t>(stream.sampleRate * stream.bytesPerFrame);
@@ -314,7 +314,7 @@ void Check::checkByteRate(const StreamDescription& stream)
              .found = real});
 }
 
-/// Of codings without packets of one size only the decoder can tell.
+/// For codings without packets of one size only the decoder could tell.
 void Check::checkFact(const AudioDescription& sound)
 {
     const StreamDescription& stream = sound.stream();

@@ -1,4 +1,4 @@
-// Where a container ends, as a walk over its chunks finds it.
+// The end of a container, as a walk over its chunks finds it.
 #pragma once
 
 #include "media/containers/ChunkWalk.h"
@@ -9,7 +9,7 @@
 /// Where a new chunk goes.
 struct ContainerEnd {
     ContainerChkExtended header; // in host order
-    platform::WalkedChunk last;  // the chunk behind which it goes
+    platform::WalkedChunk last;  // the chunk that it follows
     std::int64_t insertion = 0;
     std::int64_t dataSize = 0; // of the chunk "data"
 };

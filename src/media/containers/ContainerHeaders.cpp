@@ -24,19 +24,19 @@ std::int64_t fieldValue(std::uint32_t size, bool isWAVE)
     return isWAVE ? std::int64_t{size} : std::int64_t{static_cast<std::int32_t>(size)};
 }
 
-/// Whether a header is "WAVE", in file layout or in host order.
+/// Whether the form type is "WAVE", in file layout or in host order.
 bool isWAVEInAnyOrder(FourCC formType)
 {
     return formType == kWAVE || formType == byteSwapped(kWAVE);
 }
 
-/// Of the sizes. Ids are big-endian everywhere.
+/// Byte order of the sizes. Ids are big-endian everywhere.
 std::endian orderOf(FourCC formType)
 {
     return isWAVEInAnyOrder(formType) ? std::endian::little : std::endian::big;
 }
 
-/// How many of the entries held lie within the body of a first chunk of that size.
+/// Number of entries held here that lie in the body of a first chunk of that size.
 std::size_t entriesWithin(std::uint32_t firstChunkSize)
 {
     if (firstChunkSize < ContainerChkExtended::kDs64FixedSize)
@@ -91,19 +91,19 @@ std::int32_t ContainerChkExtended::SetSize(long long newSize)
 {
     const bool hasRoom = HasValidDs64() || HasJunkReservation();
     size = clamped(newSize, IsWAVE());
-    // Kept: the limit of AIFF is this one too, although its field is clamped at half of it.
+    // Kept: AIFF has the same limit, although its field is clamped at half of it.
     if (!hasRoom)
         return newSize > kLargestUnsigned ? kChunkSizeTooLarge : 0;
     riffSize = static_cast<std::uint64_t>(newSize);
     if (newSize >= 0 && newSize <= kLargestUnsigned) {
-        id = kRIFF; // also of what was "BW64"
+        id = kRIFF; // "BW64" becomes RIFF too
         firstChunkId = kJUNK;
     } else if (firstChunkId == kJUNK) {
         id = kRF64;
         size = static_cast<std::uint32_t>(kLargestUnsigned);
         firstChunkId = kDs64;
         tableLength = 0;
-        table = {}; // what the reservation held is no table
+        table = {}; // the reservation's old content is no table
     }
     return 0;
 }
@@ -119,7 +119,7 @@ void ContainerChkExtended::ByteOrder()
         for (std::size_t i = 0; i < entriesWithin(firstChunkSize); ++i)
             turnFields(std::endian::big, table[i].id);
     }
-    if (order == std::endian::little) { // "ds64" or what may become one; other containers have none
+    if (order == std::endian::little) { // only little-endian containers have a "ds64" or room for one
         turnFields(order, riffSize, dataSize, sampleCount, tableLength);
         for (Ds64TableEntry& entry : table)
             turnFields(order, entry.size);

@@ -1,5 +1,4 @@
-// The chunks of a whole container in file order, as the audio-file service edits them and descriptions are made of
-// them.
+// All chunks of a container in file order, for edits by the audio-file service and for descriptions.
 #pragma once
 
 #include "media/containers/ChunkWalk.h"
@@ -13,35 +12,35 @@
 
 namespace platform {
 
-/// 24 bytes a chunk: what a scan keeps.
+/// What a scan keeps: 24 bytes per chunk.
 struct Chunk {
     std::uint64_t position = 0; // of the header
-    std::uint64_t size = 0;     // of the body; never beyond the end of the file
+    std::uint64_t size = 0;     // of the body; at most up to the end of the file
     FourCC id = 0;
-    bool padMissing = false;  // odd, and its writer left the pad byte out
-    bool sizeIsStale = false; // the size in the file is open (-1) or goes beyond the end of the file
+    bool padMissing = false;  // odd size, but no pad byte
+    bool sizeIsStale = false; // the stated size is open (-1) or runs past the end of the file
 };
 static_assert(sizeof(Chunk) == 24);
 
-/// A container's chunks and what is needed to change them. Positions are from the start of the file.
+/// A container's chunks and what is needed to change them. Positions count from the start of the file.
 struct ContainerLayout {
     static constexpr FourCC filler = fourCC("free"); // in every container
 
     Container container;
     std::vector<Chunk> chunks;
     std::uint64_t fileLength = 0;
-    std::uint64_t end = 0; // behind the last chunk: where one more would stand
-    bool isBroken = false; // the scan met bytes that are no chunk: nothing may be put behind the last one
+    std::uint64_t end = 0; // where one more chunk would go
+    bool isBroken = false; // the scan met bytes that are no chunk, so nothing may be appended
 
     ContainerKind kind() const { return container.traits->kind; }
-    /// AIFF and AIFC are told apart.
+    /// Distinguishes AIFF from AIFC.
     FourCC fileType() const
     {
         return container.formType == fourCC("AIFC") ? container.formType : container.traits->fileType;
     }
-    /// The first chunk is a "ds64" that counts.
+    /// Whether the first chunk is a "ds64" that is in force.
     bool hasSizes64() const { return container.header.HasValidDs64(); }
-    /// The first chunk is a "JUNK" that can become a "ds64".
+    /// Whether the first chunk is a "JUNK" that can become a "ds64".
     bool hasReservation() const { return container.header.HasJunkReservation(); }
     std::uint64_t headerSize() const { return container.traits->chunkHeaderSize; }
     std::uint64_t largestChunk() const { return container.traits->largestChunk; }
@@ -49,22 +48,22 @@ struct ContainerLayout {
     /// Header, body and pad byte.
     std::uint64_t extentOf(std::uint64_t size) const { return headerSize() + size + padOf(size); }
     std::uint64_t bodyOf(const Chunk& chunk) const { return chunk.position + headerSize(); }
-    /// Where the next chunk stands.
+    /// Position of the next chunk.
     std::uint64_t nextOf(const Chunk& chunk) const
     {
         return bodyOf(chunk) + chunk.size + (chunk.padMissing ? 0 : padOf(chunk.size));
     }
-    /// A chunk header in the file's form; its first bytes count. Of containers that are edited.
+    /// A chunk header in file layout, of which the first headerSize() bytes count. For containers that can be edited.
     std::array<std::byte, 12> header(FourCC id, std::uint64_t size) const;
     FourCC audioDataId() const { return container.traits->soundId; }
-    /// The first chunk with this id, or null.
+    /// The first chunk with this id; null if there is none.
     const Chunk* find(FourCC id) const;
 };
 
-/// Reads the layout of the whole file; in one pass, in time and memory in proportion to the number of chunks.
-/// kStatusParameterError for a file of another kind, kStatusOutOfMemory beyond 4,194,304 chunks.
+/// Reads the layout of the whole file in one pass, in time and memory proportional to the number of chunks.
+/// kStatusParameterError if the file is of another kind, kStatusOutOfMemory beyond 4,194,304 chunks.
 std::int32_t scanChunks(HeaderWindow& window, ContainerLayout& layout);
-/// The same through a window of its own.
+/// As above, with a window of its own.
 std::int32_t scanChunks(const FileBytes& file, ContainerLayout& layout);
 
 } // namespace platform

@@ -20,7 +20,7 @@ std::int32_t overwriteNumber(const FileBytes& file, std::uint64_t position, T va
     return file.overwrite(position, bytes);
 }
 
-/// The reservation becomes a "ds64", and RIFF becomes RF64.
+/// Turns the reservation into a "ds64", and RIFF into RF64.
 std::int32_t becomeRF64(const FileBytes& file, const ContainerLayout& layout, std::uint64_t riffSize)
 {
     std::array<std::byte, 48> start;
@@ -32,7 +32,7 @@ std::int32_t becomeRF64(const FileBytes& file, const ContainerLayout& layout, st
     storeBE(start.data() + 12, fourCC("ds64"));
     storeLE(start.data() + kRiffSizeOffset, riffSize);
     storeLE(start.data() + kDataSizeOffset, data != nullptr ? data->size : 0);
-    storeLE(start.data() + 36, std::uint64_t{0}); // sample count: for compressed data only
+    storeLE(start.data() + 36, std::uint64_t{0}); // sample count: only for compressed data
     storeLE(start.data() + 44, std::uint32_t{0}); // table length
     return file.overwrite(0, start);
 }
@@ -73,13 +73,13 @@ std::int32_t writeLastChunkSize(const FileBytes& file, ContainerLayout& layout, 
 {
     Chunk& chunk = layout.chunks.back();
     const std::uint64_t position = chunk.position + 4;
-    // The "ds64" speaks of the first one; a further one has its own 32 bits.
+    // The "ds64" describes only the first "data"; others keep their 32-bit sizes.
     const bool isData = layout.find(layout.audioDataId()) == &chunk;
     std::int32_t status = kStatusOK;
     if (layout.kind() == ContainerKind::caf) {
         status = overwriteNumber(file, position, size, std::endian::big);
     } else if (layout.kind() == ContainerKind::riff && isData && layout.hasSizes64()) {
-        // A field that is not 0xFFFFFFFF counts until it becomes so.
+        // The 32-bit field is in force until it is 0xFFFFFFFF, so it changes last.
         status = overwriteNumber(file, kDataSizeOffset, size, std::endian::little);
         if (status == kStatusOK)
             status = overwriteNumber(file, position, std::uint32_t{0xFFFFFFFF}, std::endian::little);

@@ -17,7 +17,7 @@ FourCC codeAt(BytesView start, std::size_t offset)
     return start.size() >= offset + sizeof(FourCC) ? loadBE<FourCC>(start.data() + offset) : 0;
 }
 
-/// Whether an identifier of 16 bytes is made of a name and these bytes.
+/// Whether a 16-byte identifier consists of this name and these bytes.
 bool isIdentifier(BytesView bytes, FourCC name, std::string_view rest)
 {
     return bytes.size() >= sizeof name + rest.size() && codeAt(bytes, 0) == name &&
@@ -30,7 +30,7 @@ bool isRIFF(BytesView start)
     return (id == fourCC("RIFF") || id == fourCC("RF64") || id == fourCC("BW64")) && codeAt(start, 8) == fourCC("WAVE");
 }
 
-/// Kept: the last character is not looked at: AIFF, AIFC, and any other.
+/// Kept: the last character is ignored, so any of them passes, not only AIFF and AIFC.
 bool isIFF(BytesView start)
 {
     return codeAt(start, 0) == fourCC("FORM") && codeAt(start, 8) >> 8 == fourCC("AIFF") >> 8;
@@ -48,7 +48,7 @@ bool isRIFX(BytesView start)
 
 bool isWave64(BytesView start)
 {
-    // The last 12 bytes of the identifiers of the file itself, and of all that have a name in RIFF.
+    // The last 12 bytes of the identifier of the file itself, and of all that have a name in RIFF.
     constexpr std::string_view file("\x2E\x91\xCF\x11\xA5\xD6\x28\xDB\x04\xC1\0\0", 12);
     constexpr std::string_view named("\xF3\xAC\xD3\x11\x8C\xD1\0\xC0\x4F\x8E\xDB\x8A", 12);
     return start.size() >= 40 && isIdentifier(start, fourCC("riff"), file) &&
@@ -60,7 +60,7 @@ bool isAU(BytesView start)
     return start.size() >= 8 && codeAt(start, 0) == fourCC(".snd");
 }
 
-/// Kept: nor is that of "CAT ".
+/// Kept: so is that of "CAT ".
 bool isREX2(BytesView start)
 {
     return codeAt(start, 0) >> 8 == fourCC("CAT ") >> 8 && codeAt(start, 8) == fourCC("REX2") &&
@@ -82,11 +82,11 @@ constexpr ContainerTraits::Role cafRoles[] = {{fourCC("desc"), ChunkRole::essent
                                               {fourCC("chan"), ChunkRole::supporting}};
 constexpr ContainerTraits::Role rex2Roles[] = {{fourCC("HEAD"), ChunkRole::essential}};
 
-constexpr std::uint64_t kMostUnsigned = 0xFFFFFFFE; // 0xFFFFFFFF says: look into the "ds64"
+constexpr std::uint64_t kMostUnsigned = 0xFFFFFFFE; // 0xFFFFFFFF refers to the "ds64"
 constexpr std::uint64_t kMostSigned = 0x7FFFFFFF;
 constexpr std::uint64_t kMost64 = INT64_MAX;
 
-/// In the order of the kinds.
+/// In the order of ContainerKind.
 constexpr std::array<ContainerTraits, 7> kContainers{{
     {.kind = ContainerKind::riff,
      .fileType = fourCC("WAVE"),

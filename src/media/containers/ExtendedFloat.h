@@ -7,9 +7,9 @@ namespace platform {
 
 inline constexpr std::size_t kExtendedSize = 10; // bytes
 
-/// Zero for what is no finite number, and for negative ones: no rate is.
+/// Zero for numbers that are not finite and for negative ones, which are no rates.
 double loadExtended(const std::byte* bytes);
-/// Zero for negative numbers.
+/// Stores zero for negative numbers.
 void storeExtended(std::byte* bytes, double value);
 
 } // namespace platform

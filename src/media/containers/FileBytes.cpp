@@ -17,7 +17,7 @@ bool inFileRange(std::uint64_t position, std::size_t count)
     return position <= limit && count <= limit - position;
 }
 
-/// The status of the call that just failed; a call that fails without saying why is an input/output error.
+/// Status of the call that just failed; an input/output error if errno does not say why.
 std::int32_t failure()
 {
     const std::int32_t status = PosixErrorToOSErr();

@@ -1,4 +1,4 @@
-// The bytes of one open file, read and written whole through the call table.
+// The bytes of one open file, read and written completely through the table of system calls.
 #pragma once
 
 #include "media/containers/ByteSource.h"
@@ -21,15 +21,14 @@ public:
     std::int32_t length(std::uint64_t& length) const;
     /// Reads up to `count` bytes; fewer only at the end of the file.
     std::int32_t readSome(std::uint64_t position, void* to, std::size_t count, std::size_t& got) const override;
-    /// Reads all of them; kStatusEndOfFile when the file is shorter.
+    /// Reads all bytes; kStatusEndOfFile if the file is shorter.
     std::int32_t read(std::uint64_t position, void* to, std::size_t count) const;
     std::int32_t write(std::uint64_t position, const void* from, std::size_t count) const;
-    /// As `write`, over bytes that exist, in one call of the system. When it fails the former bytes are put back.
-    /// Writes nothing when the bytes are there already.
+    /// As `write`, over existing bytes, in one system call. A failure puts the former bytes back. Writes nothing if the
+    /// bytes are equal.
     std::int32_t overwrite(std::uint64_t position, BytesView bytes) const;
     std::int32_t setLength(std::uint64_t length) const;
-    /// A barrier: what was written before is on the disk before what is written after. Nothing where the file system
-    /// has no such thing.
+    /// A barrier: earlier writes reach the disk before later ones. Does nothing on a file system without such a call.
     std::int32_t flush() const;
 
 private:

@@ -41,7 +41,7 @@ std::uint32_t atMost32Bits(std::uint64_t number)
     return static_cast<std::uint32_t>(std::min(number, kMost32));
 }
 
-/// Filler, so that the samples, `ahead` bytes behind it, begin at the offset that is wanted.
+/// Adds filler so that the samples, `ahead` bytes behind it, begin at the wanted offset.
 void fillUp(ByteWriter& out, const NewContainer& file, std::size_t ahead)
 {
     const bool isCAF = file.fileType == kCaff;
@@ -79,21 +79,21 @@ void writeFormatChunk(ByteWriter& out, const NewContainer& file)
     out.write(bits);
     if (extensible) {
         out.write<std::uint16_t>(22);
-        out.write(bits); // all of them valid
+        out.write(bits); // all bits are valid
         out.write(*file.speakers);
         out.write(tag);
         out.write(std::as_bytes(std::span(tagGUID)));
     } else if (isFloat(file)) {
         out.write<std::uint16_t>(0);
     }
-    if (isFloat(file) && file.isCounted) { // what is not PCM counts its frames
+    if (isFloat(file) && file.isCounted) { // only formats other than PCM count their frames
         out.writeFourCC(fourCC("fact"));
         out.write<std::uint32_t>(4);
         out.write(atMost32Bits(file.frames));
     }
 }
 
-/// The body of a "ds64", or of the "JUNK" that may become one: kept current in both.
+/// The body of a "ds64" or of the "JUNK" that may become one; both are kept up to date.
 void writeReservation(ByteWriter& out, FourCC id, std::uint64_t riffSize, const NewContainer& file)
 {
     out.writeFourCC(id);
@@ -127,7 +127,7 @@ Bytes headerOfWAVE(const NewContainer& file)
     return size <= kMost32 || file.hasReservation ? written(size) : Bytes{};
 }
 
-/// The compression type, and its name as a text behind its length, padded to an even length.
+/// Writes the compression type and its name as a counted text, padded to an even length.
 void writeCompression(ByteWriter& out, const NewContainer& file)
 {
     const bool isDouble = file.format.bitsPerChannel == 64;
@@ -219,7 +219,7 @@ Bytes headerOfCAF(const NewContainer& file)
     return out.take();
 }
 
-/// Whether the container can hold the samples; sets what they are not free to be.
+/// Whether the container can hold the samples; also sets the properties that it dictates.
 bool fits(NewContainer& file)
 {
     constexpr std::uint64_t mostData = std::uint64_t{1} << 62;
@@ -234,7 +234,7 @@ bool fits(NewContainer& file)
     if (format.bytesPerFrame != bytesPerFrame || file.frames > mostData / bytesPerFrame ||
         (isWAVE && format.sampleRate > static_cast<double>(kMost32)))
         return false;
-    // 8-bit samples have no byte order, and each container has one kind of them.
+    // 8-bit samples have no byte order, and each container supports only one kind of them.
     if (format.bitsPerChannel == 8)
         format.formatFlags = isWAVE             ? 0U
                              : isAIFF || isAIFC ? Flag::isSignedInteger | Flag::isBigEndian

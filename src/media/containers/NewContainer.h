@@ -1,4 +1,4 @@
-// The headers of new audio files: all that stands ahead of their samples.
+// The headers of new audio files: everything ahead of their samples.
 #pragma once
 
 #include "media/samples/StreamDescription.h"
@@ -11,21 +11,22 @@ namespace platform {
 
 struct NewContainer {
     FourCC fileType = 0; // "WAVE", "AIFF", "AIFC" or "caff"
-    /// Packed linear PCM; bytes and frames of a packet need not be given. WAVE is little-endian, AIFF big-endian
-    /// without floats, AIFC has no little-endian floats; 8 bits are unsigned in WAVE, signed elsewhere, whatever is
-    /// said.
+    /// Packed linear PCM; bytes and frames per packet may be left out. WAVE is little-endian, AIFF big-endian without
+    /// floats, AIFC has no little-endian floats; 8-bit samples are unsigned in WAVE and signed elsewhere, whatever the
+    /// format says.
     StreamDescription format;
-    /// That the channels feed, as bits of WAVE's channel mask; 0 says that they feed none in particular. Without it
-    /// WAVE has the plain format chunk, which says nothing of speakers.
+    /// Speakers of the channels as bits of WAVE's channel mask; 0 if they are for no particular ones. Without a value
+    /// WAVE gets the plain format chunk, which cannot name speakers.
     std::optional<std::uint32_t> speakers;
-    std::uint64_t frames = 0; // that will follow
-    bool isCounted = true; // in a "fact" where the format asks for one; whoever adds frames later cannot keep it true
-    bool hasReservation = false; // of WAVE: room ("JUNK") to grow past 4 GiB; makes it RF64 once it has
-    Bytes chunks = {};           // ahead of the samples: whole ones, with headers and pad bytes
-    std::size_t dataOffset = 0;  // filler makes the samples begin here; 0 for none
+    std::uint64_t frames = 0; // frames that will follow
+    // Writes a "fact" if the format wants one; callers who add frames later cannot keep it true.
+    bool isCounted = true;
+    bool hasReservation = false; // WAVE: room ("JUNK") to exceed 4 GiB; RF64 if it is exceeded already
+    Bytes chunks = {};           // complete chunks ahead of the samples, with headers and pad bytes
+    std::size_t dataOffset = 0;  // start of the samples, reached by filler; 0 for any
 };
 
-/// Empty when the container cannot hold the format, or its size fields cannot say so many frames.
+/// Empty if the container cannot hold the format, or if its size fields cannot state that many frames.
 Bytes headerOf(NewContainer file);
 
 } // namespace platform

@@ -23,15 +23,14 @@ enum : std::uint16_t {
     kTagExtensible = 0xFFFE,
 };
 
-// The bytes behind the tag in the sub-format GUIDs that stand for a tag: the general one, and the one of Ambisonic
-// files.
+// The bytes after the tag in sub-format GUIDs that stand for a tag: the general GUID, and that of Ambisonic files.
 constexpr std::array<std::uint8_t, 14> kTagGUID{0x00, 0x00, 0x00, 0x00, 0x10, 0x00, 0x80,
                                                 0x00, 0x00, 0xAA, 0x00, 0x38, 0x9B, 0x71};
 constexpr std::array<std::uint8_t, 14> kAmbisonicGUID{0x00, 0x00, 0x21, 0x07, 0xD3, 0x11, 0x86,
                                                       0x44, 0xC8, 0xC1, 0xCA, 0x00, 0x00, 0x00};
 
-/// The bytes that a sample stands in: those that its share of a frame has, which counts for 20 bits in 3 bytes or 24 in
-/// 4, unless it cannot be. A float fills its bytes.
+/// Bytes per sample. A sample's share of the frame decides, as with 20 bits in 3 bytes or 24 in 4, unless it is
+/// impossible. A float fills its bytes.
 std::uint32_t sampleBytes(std::uint32_t bits, std::uint32_t bytesPerFrame, std::uint32_t channels, bool isFloat)
 {
     const std::uint32_t fromBits = bits / 8 + (bits % 8 != 0 ? 1 : 0);
@@ -51,7 +50,7 @@ struct Linear {
 void setLinear(StoredFormat& format, const Linear& linear)
 {
     StreamDescription& stream = format.stream;
-    constexpr std::uint32_t most = 9; // bytes of a sample; with more than 8 it is none that is read
+    constexpr std::uint32_t most = 9; // bytes per sample; above 8 the samples cannot be read anyway
     const std::uint32_t bytes = std::min(linear.bytesPerSample, most);
     format.coding = stream.formatId = StreamDescription::linearPCM;
     stream.formatFlags = (linear.isFloat      ? Flag::isFloat
@@ -73,7 +72,7 @@ void setLinear(StoredFormat& format, const Linear& linear)
 std::optional<StoredFormat> storedFormatOfWAVE(BytesView bytes, std::endian order)
 {
     constexpr std::size_t plainSize = 16;
-    if (bytes.size() < plainSize - 2) // the oldest writers leave out the bits
+    if (bytes.size() < plainSize - 2) // the oldest writers omit the bits
         return std::nullopt;
     std::array<std::byte, kMostOfStoredFormat> body{};
     const std::size_t there = std::min(bytes.size(), body.size());
@@ -87,8 +86,8 @@ std::optional<StoredFormat> storedFormatOfWAVE(BytesView bytes, std::endian orde
     reader.skip(4); // bytes per second
     const auto blockAlign = reader.read<std::uint16_t>();
     stream.bitsPerChannel = reader.read<std::uint16_t>();
-    reader.skip(2); // the size of what follows: a chunk as short as that tells as much
-    const auto framesPerBlock = reader.read<std::uint16_t>(); // of ADPCM; of extensible formats the valid bits
+    reader.skip(2);                                           // size of the rest, which the chunk's own size tells too
+    const auto framesPerBlock = reader.read<std::uint16_t>(); // for ADPCM; valid bits for extensible formats
     if (tag == kTagExtensible && there == body.size()) {
         format.validBits = framesPerBlock <= stream.bitsPerChannel ? framesPerBlock : 0U;
         format.speakers = reader.read<std::uint32_t>();
@@ -144,7 +143,7 @@ std::optional<StoredFormat> storedFormatOfAIFF(BytesView bytes, bool isAIFC)
     };
     struct PacketType {
         FourCC type, id;
-        std::uint32_t bytes, frames; // bytes of one channel
+        std::uint32_t bytes, frames; // bytes per channel
     };
     static constexpr PacketType packetTypes[] = {
         {fourCC("alaw"), fourCC("alaw"), 1, 1},   {fourCC("ALAW"), fourCC("alaw"), 1, 1},
@@ -217,7 +216,7 @@ std::optional<StoredFormat> storedFormatOfAU(BytesView bytes)
     constexpr std::size_t size = 24, encodingOffset = 12;
     constexpr std::uint32_t muLaw = 1, aLaw = 27;
     static constexpr std::array<Linear, 6> linearEncodings{
-        {{.bytesPerSample = 1, .isBigEndian = true}, // from 2 on
+        {{.bytesPerSample = 1, .isBigEndian = true}, // version 2 on
          {.bytesPerSample = 2, .isBigEndian = true},
          {.bytesPerSample = 3, .isBigEndian = true},
          {.bytesPerSample = 4, .isBigEndian = true},

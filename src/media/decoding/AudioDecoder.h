@@ -1,4 +1,4 @@
-// A decoder of one open file: what the converting reader stands on. A module that is loaded implements it too, so that
+// A decoder of one open file, on which the converting reader stands. Modules loaded at run time implement it too, so
 // everything here is inline or pure.
 #pragma once
 
@@ -10,7 +10,7 @@
 
 namespace platform {
 
-/// Owns the file. Frames are counted from the first valid one, priming left out. The formats do not change.
+/// Owns the file. Frames count from the first valid one, after priming. The formats never change.
 class AudioDecoder {
 public:
     AudioDecoder() = default;
@@ -18,27 +18,27 @@ public:
     AudioDecoder(const AudioDecoder&) = delete;
     AudioDecoder& operator=(const AudioDecoder&) = delete;
 
-    /// How the file holds its audio.
+    /// How the file stores its audio.
     virtual const StreamDescription& fileFormat() const = 0;
-    /// What read() gives: interleaved, packed linear PCM of a supported sample, at the file's rate and channel count.
+    /// What read() delivers: interleaved, packed linear PCM at the file's rate and channel count.
     virtual const StreamDescription& frameFormat() const = 0;
     virtual std::uint64_t frameCount() const = 0;
-    /// What else the file says; channels stand in the order of the speakers' bits. None of linear PCM.
+    /// Further facts that the file states, channels in the order of the speakers' bits. Empty for linear PCM.
     virtual SoundFacts facts() const { return {}; }
-    /// False when the format has none.
+    /// False if the format has none.
     virtual bool packetTable(PacketTable&) const { return false; }
-    /// Frames among those read so far for which the file has none that can be decoded: silence stands for them.
+    /// Of the frames read so far, the number that the file lacks or cannot decode; they are read as silence.
     virtual std::uint64_t missingFrames() const { return 0; }
-    /// As ConvertingReader's.
+    /// As ConvertingReader::checksum.
     virtual ConvertingReader::Checksum checksum() const { return ConvertingReader::Checksum::notCompared; }
     virtual void compareChecksum() {}
-    /// The file itself, which stays the decoder's: answers "ffmt" with its type code. Null when there is none.
+    /// The file itself, owned by the decoder; answers "ffmt" with its type code. Null if there is none.
     virtual AudioHandle* file() = 0;
 
-    /// Every frame number is taken; beyond the last, nothing is read.
+    /// Any frame number is accepted; nothing can be read beyond the last.
     virtual std::int32_t seek(std::uint64_t frame) = 0;
-    /// Reads at most `frames` frames and sets it to their number; 0 with success only at the end. After a failure a
-    /// seek comes first.
+    /// Reads up to `frames` frames and sets it to their number; 0 with success only at the end. After a failure, seek
+    /// before reading on.
     virtual std::int32_t read(std::uint32_t& frames, void* to) = 0;
 };
 

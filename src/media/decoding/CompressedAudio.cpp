@@ -15,25 +15,25 @@ namespace platform {
 
 namespace {
 
-/// How files begin that are left to the module: with these bytes, of which the bits of the mask count.
+/// How files begin that the module handles: these bytes, compared under the mask.
 struct Beginning {
     std::size_t offset;
     std::string_view bytes;
     FourCC fileType;
-    std::string_view mask = {}; // empty: all
+    std::string_view mask = {}; // empty: all bits count
 };
 constexpr std::string_view kFrame = "\xFF\xF6"; // sync and layer of an MPEG frame
 constexpr Beginning kBeginnings[] = {
     {0, "OggS", fourCC("ogg ")},
-    {0, "\x30\x26\xB2\x75", fourCC("asf ")}, // by the start of its identifier
+    {0, "\x30\x26\xB2\x75", fourCC("asf ")}, // start of the identifier
     {0, "wvpk", fourCC("wvpk")},
     {0, "MAC ", fourCC("ape ")},
     {0, "TTA1", fourCC("tta ")},
     {0, "tBaK", fourCC("tak ")},
     {0, "\x1A\x45\xDF\xA3", fourCC("mkv ")},
     {0, "\x0B\x77", fourCC("ac-3")},
-    {0, "fLaC", fourCC("flac")},             // behind a tag
-    {0, "\xFF\xF0", fourCC("adts"), kFrame}, // rates at which a decoder may double them
+    {0, "fLaC", fourCC("flac")},             // after a tag
+    {0, "\xFF\xF0", fourCC("adts"), kFrame}, // rates whose frames a decoder may double
     {0, "\xFF\xF4", fourCC("MPG2"), kFrame},
     {0, "\xFF\xF2", fourCC("MPG3"), kFrame},
     {0, "Creative Voice", fourCC("voc ")},
@@ -53,10 +53,7 @@ constexpr Beginning kBeginnings[] = {
     {4, "\xF8\x72\x6F\xBB", fourCC("mlp ")},
     {0, "\x56\xE0", fourCC("loas"), "\xFF\xE0"},
     {0, "FLV\x01", fourCC("flv ")},
-    {0,
-     {"\x47\x40\x00\x10", 4},
-     fourCC("MPGT"),
-     {"\xFF\xFF\xE0\xD0", 4}}, // a packet that begins a table, not scrambled
+    {0, {"\x47\x40\x00\x10", 4}, fourCC("MPGT"), {"\xFF\xFF\xE0\xD0", 4}}, // a packet that begins an unscrambled table
     {0, {"\x00\x00\x01\xBA", 4}, fourCC("mpeg")},
     {0, ".RMF", fourCC("rm  ")},
     {0, ".SoX", fourCC("sox ")},
@@ -67,7 +64,7 @@ constexpr Beginning kBeginnings[] = {
     {0, " paf", fourCC("epaf")},
     {0, "fap ", fourCC("epaf")},
     {0, "2BIT", fourCC("avr ")},
-    {0, {"\xF0\x7E\x00\x01", 4}, fourCC("sds "), {"\xFF\xFF\x80\xFF", 4}}, // whatever the channel
+    {0, {"\xF0\x7E\x00\x01", 4}, fourCC("sds "), {"\xFF\xFF\x80\xFF", 4}}, // for any channel
     {0, "ALawSoundFile", fourCC("wve ")},
     {0, {"\x80\x00\x00\x00\x03\x12\x04", 7}, fourCC("adx "), {"\xFF\xFF\x00\x00\xFF\xFF\xFF", 7}},
     {0, "nut/multimedia", fourCC("nut ")},
@@ -77,11 +74,11 @@ constexpr Beginning kBeginnings[] = {
     {0, "ADIF", fourCC("adif")},
     {8, "QLCM", fourCC("qcp ")},
     {8, "MAUD", fourCC("iff ")},
-    {8, "WAVE", fourCC("WAVE")}, // behind a tag
+    {8, "WAVE", fourCC("WAVE")}, // after a tag
     {8, "AVI ", fourCC("AVI ")},
     {8, "XWMA", fourCC("xwma")},
     {8, "8SVX", fourCC("iff ")},
-    {4, "ftyp", fourCC("mp4f")}, // one that the library does not find its way in
+    {4, "ftyp", fourCC("mp4f")}, // a file in which the library itself finds no track
     {4, "moov", fourCC("mp4f")},
     {4, "mdat", fourCC("mp4f")},
 };
@@ -107,7 +104,7 @@ FourCC fileTypeOf(BytesView start)
     return found != std::end(kBeginnings) ? found->fileType : 0;
 }
 
-/// The first bytes behind the tags that a stream of frames may have ahead of it.
+/// The first bytes after the tags that may precede a stream of frames.
 Bytes startBehindTags(const URL& url, BytesView start)
 {
     constexpr std::size_t wanted = 16;
@@ -121,7 +118,7 @@ Bytes startBehindTags(const URL& url, BytesView start)
     return {bytes.begin(), bytes.end()};
 }
 
-/// The file's type as the decoder names it, where it does.
+/// The file's type according to the decoder, if it has a name for it.
 FourCC typeOfOpenFile(ConvertingReader& reader)
 {
     AudioHandle* file = nullptr;

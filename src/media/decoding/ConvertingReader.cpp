@@ -18,11 +18,11 @@ namespace platform {
 
 struct ConvertingReader::Implementation {
     std::unique_ptr<AudioDecoder> decoder;
-    std::unique_ptr<ResamplingDecoder> resampling; // over it, where the client's rate is another
+    std::unique_ptr<ResamplingDecoder> resampling; // on top of the decoder if the client's rate differs
     StreamDescription client;
-    Bytes layout; // of the client's channels; empty when none was set
+    Bytes layout; // the client's channel layout; empty if none was set
     FrameConverter converter;
-    Bytes piece; // what the decoder gave and the converter takes
+    Bytes piece; // bytes from the decoder for the converter
     std::uint64_t frame = 0;
     bool isLost = false; // the source is not at `frame`
 
@@ -38,8 +38,8 @@ struct ConvertingReader::Implementation {
 
 namespace {
 
-/// Linear PCM that the library reads itself; null, with the status, when it is none. Status kFormatNotSupported says
-/// that others may be asked.
+/// Opens linear PCM that the library reads itself; null, with the status, if the file is none. kFormatNotSupported
+/// means that other decoders may be tried.
 std::unique_ptr<AudioDecoder> openLinearPCM(const URL& url, std::int32_t& status)
 {
     auto file = AudioFile::openToRead(url, &status);
@@ -61,8 +61,8 @@ std::unique_ptr<AudioDecoder> openLinearPCM(const URL& url, std::int32_t& status
     return status == kStatusOK ? std::make_unique<LinearPCMDecoder>(std::move(file), format, frames) : nullptr;
 }
 
-/// Where the client's rate is another than the decoder's; null, with status 0, where it is not. Converts the channels
-/// of the file or those of the client, whichever are fewer.
+/// Makes a rate conversion if the client's rate differs from the decoder's; null, with status 0, if it does not.
+/// Converts either the file's channels or the client's, whichever are fewer.
 std::unique_ptr<ResamplingDecoder> makeResampling(AudioDecoder& decoder, const StreamDescription& client,
                                                   std::int32_t& status, Error* error)
 {
@@ -200,7 +200,7 @@ std::int32_t ConvertingReader::seek(std::int64_t frame)
     return status;
 }
 
-/// Adds to `done` what was read; a piece at a time where frames are converted.
+/// Adds the frames read to `done`; if frames are converted, reads piece by piece.
 std::int32_t ConvertingReader::Implementation::readFrames(std::byte* to, std::uint32_t wanted, std::uint32_t& done)
 {
     const auto most =

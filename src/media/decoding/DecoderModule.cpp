@@ -16,7 +16,7 @@ constexpr const char* kPackage = "libktfiles-ffmpeg";
 
 const DecoderModule* replacement = nullptr;
 
-/// No way was found: says so in `status`, which may have a reason of its own, and in `error`.
+/// Reports in `status` and `error` that nothing could decode the file; `status` may already have a reason.
 void failWith(std::int32_t& status, Error* error, const char* reason)
 {
     if (status == kStatusOK)
@@ -24,7 +24,7 @@ void failWith(std::int32_t& status, Error* error, const char* reason)
     fail(error, ErrorDomain::status, status, status == AudioHandle::kFormatNotSupported ? reason : StatusText(status));
 }
 
-/// `what` is wanted and there is no module.
+/// Reports that there is no module for `what`.
 void failWithoutModule(std::int32_t& status, Error* error, const std::string& what)
 {
     status = AudioHandle::kFormatNotSupported;

@@ -1,5 +1,5 @@
-// Where decoders of everything but linear PCM, and conversion of sample rates, come from: a module that lies beside the
-// library and is loaded when the first such file is met, so that hosts of linear PCM never pay for it.
+// Loads the module that decodes everything but linear PCM and converts sample rates. It lies beside the library and is
+// loaded when the first such file is met, so hosts that only read linear PCM never pay for it.
 #pragma once
 
 #include "media/decoding/AudioDecoder.h"
@@ -14,28 +14,29 @@
 namespace platform {
 
 /// What the module "ktfiles/libktfiles-decoders.so", beside the library, exports as "ktfiles_decoderModule". Functions
-/// give an object for `delete`, or null with `*status`, AudioHandle::kFormatNotSupported when they know no way. They
-/// throw nothing.
+/// return an object for `delete`, or null with `*status`: AudioHandle::kFormatNotSupported if they do not know the
+/// format. They throw nothing.
 struct DecoderModule {
-    static constexpr std::uint32_t currentVersion = 3; // of this struct and of the interfaces; another is not used
+    // Of this struct and the interfaces; a module of another version is not used.
+    static constexpr std::uint32_t currentVersion = 3;
 
     std::uint32_t version;
-    /// Takes the source over in any case.
+    /// Always takes ownership of the source.
     AudioDecoder* (*openPackets)(PacketSource* source, std::int32_t* status);
     AudioDecoder* (*openFile)(const char* path, std::int32_t* status);
     Resampler* (*makeResampler)(std::uint32_t channels, std::uint32_t fromRate, std::uint32_t toRate,
                                 std::int32_t* status);
 };
 
-/// The module in force, loaded when this is asked for the first time; null when there is none of the current version.
+/// The module in use, loaded at the first call; null if there is none of the current version.
 const DecoderModule* decoderModule();
-/// Puts another in its place, for tests; null gives it back. One of another version stands for no module.
+/// Replaces the module for tests; null restores it. A module of another version counts as none.
 void replaceDecoderModule(const DecoderModule* module);
 
-/// The decoder of a file that is not linear PCM. Null with `status` and `error` (which may be null); without the module
-/// it is kFormatNotSupported, and the error names what to install.
+/// The decoder of a file that is not linear PCM. Null with `status` and `error` (which may be null); without a module
+/// it is kFormatNotSupported, and the error names the package to install.
 std::unique_ptr<AudioDecoder> openWithDecoderModule(const std::string& path, std::int32_t& status, Error* error);
-/// A conversion of sample rates, which must be whole hertz; null as above.
+/// A sample rate conversion between whole rates in hertz; null as above.
 std::unique_ptr<Resampler> makeResampler(std::uint32_t channels, double fromRate, double toRate, std::int32_t& status,
                                          Error* error);
 

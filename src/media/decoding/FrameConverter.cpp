@@ -9,7 +9,7 @@ namespace {
 
 constexpr std::size_t kPieceBytes = 64 * 1024;
 
-/// Samples of one byte have no order: it is that of the processor.
+/// Samples of one byte get the processor's byte order, because they have none.
 SampleFormat normalized(SampleFormat format)
 {
     if (format.bits == 8)

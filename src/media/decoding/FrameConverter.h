@@ -1,4 +1,4 @@
-// Frames of linear PCM to another sample format and channel count, by the shared sample conversions.
+// Converts frames of linear PCM to another sample format and channel count.
 #pragma once
 
 #include "media/samples/StreamDescription.h"
@@ -8,19 +8,19 @@
 
 namespace platform {
 
-/// Takes its memory when it is made, none when it converts. Both formats must be packed PCM (isPackedPCM).
+/// Allocates on construction only, never while it converts. Both formats must be packed PCM (isPackedPCM).
 class FrameConverter {
 public:
     FrameConverter() = default;
     FrameConverter(const StreamDescription& from, const StreamDescription& to);
 
-    /// Nothing to do: frames can be read where they are wanted.
+    /// Whether nothing needs converting, so that frames can be read straight to their destination.
     bool isCopy() const { return road_ == Road::copy; }
-    /// Floats may be NaN or infinite; integers are neither.
+    /// Whether the result may contain NaN or infinity, which only floats can be.
     bool mayGiveNoNumbers() const { return from_.isFloat; }
-    /// How many frames are converted at a time.
+    /// Number of frames converted at a time.
     std::size_t piece() const { return piece_; }
-    /// `frames` is at most piece(); `from` and `to` do not overlap. `to` is aligned for floats when it is to hold them.
+    /// `frames` is at most piece(). `from` and `to` must not overlap; `to` is aligned for floats if it receives them.
     void convert(const std::byte* from, std::byte* to, std::size_t frames);
 
 private:
@@ -33,8 +33,8 @@ private:
     std::size_t fromChannels_ = 1, toChannels_ = 1;
     std::size_t piece_ = 1;
     Road road_ = Road::copy;
-    std::vector<float> floats_; // in the channels that come
-    std::vector<float> mixed_;  // in those that are wanted
+    std::vector<float> floats_; // in the source's channels
+    std::vector<float> mixed_;  // in the destination's channels
 };
 
 } // namespace platform

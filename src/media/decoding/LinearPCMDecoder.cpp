@@ -10,9 +10,9 @@ namespace platform {
 namespace {
 
 using Flag = StreamDescription::Flag;
-constexpr std::uint32_t kMaxChannels = 0xFFFF; // what WAVE and AIFF can count
+constexpr std::uint32_t kMaxChannels = 0xFFFF; // the most that WAVE and AIFF can state
 
-/// The packed format of the bytes that the samples stand in.
+/// The packed format of the bytes that hold the samples.
 StreamDescription frameFormatOf(const StreamDescription& file)
 {
     StreamDescription format = file;

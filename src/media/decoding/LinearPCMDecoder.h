@@ -1,4 +1,4 @@
-// Linear PCM as a decoder: the packets of the audio-file service are the frames.
+// Linear PCM as a decoder: the packets of the audio-file service are frames.
 #pragma once
 
 #include "media/decoding/AudioDecoder.h"
@@ -10,9 +10,9 @@ namespace platform {
 
 class LinearPCMDecoder final : public AudioDecoder {
 public:
-    /// Samples of other than whole bytes are taken as the bytes that they stand in, which they fill from the top.
+    /// Samples that are no whole number of bytes are read as the bytes that hold them, which they fill from the top.
     static bool canDecode(const StreamDescription& fileFormat);
-    /// The file's format must be one that canDecode() takes.
+    /// canDecode() must accept the file's format.
     LinearPCMDecoder(std::unique_ptr<AudioFile> file, const StreamDescription& fileFormat, std::uint64_t frameCount);
 
     const StreamDescription& fileFormat() const override { return fileFormat_; }
@@ -30,8 +30,8 @@ private:
     std::uint64_t frame_ = 0;
 };
 
-/// How frames of a format stand in memory; false unless they are interleaved, packed linear PCM of a supported sample
-/// and of 1 to 65,535 channels.
+/// Sets the sample format of frames in memory; false unless they are interleaved, packed linear PCM of a supported
+/// sample format with 1 to 65,535 channels.
 bool isPackedPCM(const StreamDescription& format);
 
 } // namespace platform

@@ -12,8 +12,8 @@ namespace platform {
 
 namespace {
 
-// The filter: a windowed sinc of 128 crossings (at the lower of the two rates) under a Kaiser window. 22.5 kHz are 119
-// dB down when 48 kHz become 44.1.
+// The filter is a sinc with 128 crossings at the lower rate, under a Kaiser window. From 48 to 44.1 kHz it attenuates
+// 22.5 kHz by 119 dB.
 constexpr double kCrossings = 128;
 constexpr double kKaiserBeta = 12;
 constexpr double kCutoff = 0.95;
@@ -66,7 +66,7 @@ PolyphaseResampler::PolyphaseResampler(std::uint32_t channels, std::size_t taps,
     reset();
 }
 
-/// Each passes a constant level as it is.
+/// Every filter passes a constant level unchanged.
 void PolyphaseResampler::buildFilters(double factor)
 {
     const double half = static_cast<double>(taps_) / 2;
@@ -98,7 +98,7 @@ std::int32_t PolyphaseResampler::reset()
     return kStatusOK;
 }
 
-/// What is no longer needed goes when the room is used up, not each time.
+/// Discards frames that are no longer needed only when the room is used up.
 void PolyphaseResampler::makeRoom(std::size_t frames)
 {
     if (filled_ + frames <= capacity_)
@@ -109,7 +109,7 @@ void PolyphaseResampler::makeRoom(std::size_t frames)
     std::vector<float>& target = larger.empty() ? samples_ : larger;
     for (std::size_t channel = 0; channel < channels_ && kept > 0; ++channel) {
         const float* const from = samples_.data() + channel * capacity_ + position_;
-        std::copy_n(from, kept, target.data() + channel * capacity); // towards the start, where it is the same block
+        std::copy_n(from, kept, target.data() + channel * capacity); // to the block's start, or the new block
     }
     if (!larger.empty())
         samples_.swap(larger);
@@ -133,7 +133,7 @@ std::int32_t PolyphaseResampler::convert(const float* from, std::uint32_t taken,
 {
     if (taken > 0)
         take(from, taken);
-    // The last frame that can be made has its filter end with what is there.
+    // The filter of the last frame that can be made ends with the last frame that is there.
     const std::size_t room = filled_ >= position_ + taps_ ? filled_ - position_ - taps_ + 1 : 0;
     const std::size_t possible = room > 0 ? (room * phases_ - phase_ - 1) / step_ + 1 : 0;
     const std::size_t frames = std::min<std::size_t>(made, possible);

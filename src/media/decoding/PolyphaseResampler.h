@@ -1,5 +1,4 @@
-// Sample rate conversion between rates whose ratio has few phases: by a filter for each of them, so that every frame is
-// exact.
+// Sample rate conversion for ratios with few phases, with one filter per phase, so that every frame is exact.
 #pragma once
 
 #include "media/decoding/Resampler.h"
@@ -12,7 +11,7 @@ namespace platform {
 
 class PolyphaseResampler final : public Resampler {
 public:
-    /// Null where there would be too many filters: then frames between two of them serve, which others make.
+    /// Null if too many filters would be needed; RateConverter then interpolates between two filters.
     static std::unique_ptr<PolyphaseResampler> make(std::uint32_t channels, std::uint32_t fromRate,
                                                     std::uint32_t toRate);
 
@@ -29,10 +28,10 @@ private:
     std::size_t channels_, taps_, phases_;
     std::size_t step_; // from one output frame to the next, in phases
     std::vector<float> filters_;
-    std::vector<float> samples_; // of each channel by itself, `capacity_` apart
+    std::vector<float> samples_; // channel after channel, `capacity_` apart
     std::size_t capacity_ = 0;
-    std::size_t filled_ = 0;   // frames there
-    std::size_t position_ = 0; // the one under the first coefficient of the next output frame
+    std::size_t filled_ = 0;   // frames present
+    std::size_t position_ = 0; // of the frame under the first coefficient for the next output frame
     std::size_t phase_ = 0;
 };
 

@@ -29,7 +29,7 @@ float sumOf(const float* filter, const float* samples, std::size_t taps)
 
 #if defined(KT_AVX2)
 
-/// The sixteen sums of a channel.
+/// The sixteen partial sums of a channel.
 struct Sums {
     __m256 low, high;
 };
@@ -48,7 +48,7 @@ KT_VECTORS inline float total(const Sums& sums)
     return _mm_cvtss_f32(_mm_add_ss(two, _mm_shuffle_ps(two, two, 1)));
 }
 
-/// Channels in pairs, which share the loads of the coefficients.
+/// Processes channels in pairs, which share loaded coefficients.
 KT_VECTORS void runByVectors(PolyphaseRun run)
 {
     for (std::size_t frame = 0; frame < run.frames; ++frame, run.next()) {

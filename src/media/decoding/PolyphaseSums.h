@@ -1,4 +1,4 @@
-// The sums of products that a bank of filters makes of samples: what resampling spends its time on.
+// The sums of products over a bank of filters, on which resampling spends its time.
 #pragma once
 
 #include <cstddef>
@@ -6,10 +6,10 @@
 
 namespace platform {
 
-/// Frames to be made by a bank of filters, one for each place that an output frame can have between two input frames.
+/// A run of frames to make with a bank of filters, one for each position of an output frame between two input frames.
 struct PolyphaseRun {
-    /// A filter's length is a multiple of this, and so many sums run side by side: they are added up at last, in the
-    /// same order on every processor.
+    /// A filter's length is a multiple of this. That many partial sums run side by side and are added last, in the same
+    /// order on every processor.
     static constexpr std::size_t kSideBySide = 16;
 
     const float* filters = nullptr; // `phases` of `taps` coefficients
@@ -17,13 +17,13 @@ struct PolyphaseRun {
     std::size_t phases = 0;
     std::size_t step = 0; // from one output frame to the next, in phases
     std::size_t phase = 0;
-    const float* samples = nullptr; // under the first coefficient; of each channel by itself, `stride` apart
+    const float* samples = nullptr; // under the first coefficient; channel after channel, `stride` apart
     std::size_t stride = 0;
     std::size_t channels = 0;
     float* to = nullptr; // interleaved
     std::size_t frames = 0;
 
-    /// Goes on by one frame.
+    /// Moves on by one frame.
     void next()
     {
         phase += step % phases;
@@ -35,9 +35,9 @@ struct PolyphaseRun {
     }
 };
 
-/// Makes the frames, by vectors where the processor has them.
+/// Makes the frames, with vectors if the processor has them.
 void runPolyphase(PolyphaseRun run);
-/// The same, plainly.
+/// As above, without vectors.
 void runPolyphasePlain(PolyphaseRun run);
 
 } // namespace platform

@@ -49,10 +49,10 @@ std::int32_t ResamplingDecoder::seek(std::uint64_t frame)
 {
     isAtFrame_ = false;
     frame_ = frame;
-    if (frame >= frameCount_) // nothing will be read
+    if (frame >= frameCount_) // there is nothing to read
         return kStatusOK;
     const std::uint64_t period = frame / q_;
-    const std::uint64_t missing = lead_ - std::min(lead_, period); // of the lead: ahead of the source's first frame
+    const std::uint64_t missing = lead_ - std::min(lead_, period); // the part of the lead before the source
     toDrop_ = frame % q_ + lead_ * q_;
     silence_ = missing * p_;
     std::int32_t status = source_.seek((period - (lead_ - missing)) * p_);
@@ -62,7 +62,7 @@ std::int32_t ResamplingDecoder::seek(std::uint64_t frame)
     return status;
 }
 
-/// Gives the resampler a piece: silence ahead of the source's frames, these, or silence behind them.
+/// Feeds the resampler a piece: silence before the source's frames, the frames, or silence after them.
 std::int32_t ResamplingDecoder::feed()
 {
     std::uint32_t frames = pieceFrames_, there = 0, none = 0;
@@ -80,7 +80,7 @@ std::int32_t ResamplingDecoder::feed()
         converter_.convert(raw_.data(), reinterpret_cast<std::byte*>(piece_.data()), there);
     else
         std::fill(piece.begin(), piece.end(), 0.0F);
-    // What is no number would spread over all that the filter reaches.
+    // A NaN or infinity would spread over the filter's whole reach.
     if (converter_.mayGiveNoNumbers())
         std::replace_if(
             piece.begin(), piece.end(), [](float sample) { return !std::isfinite(sample); }, 0.0F);

@@ -1,4 +1,4 @@
-// Another sample rate: a decoder over a decoder, exact to the frame wherever it is asked to begin.
+// Another sample rate: a decoder on top of a decoder, exact to the frame wherever reading begins.
 #pragma once
 
 #include "media/decoding/AudioDecoder.h"
@@ -10,18 +10,17 @@
 
 namespace platform {
 
-/// Frame n stands at the time of the source's frame n x p / q, where p / q is the ratio of the rates in its lowest
-/// terms; there are as many as have a time ahead of the source's end: ceil(frames x q / p). Silence lies on either side
-/// of the sound.
+/// Frame n has the time of the source's frame n x p / q, where p / q is the ratio of the rates in lowest terms. There
+/// are ceil(frames x q / p) frames, all that begin before the source's end. The sound has silence on either side.
 ///
-/// A frame is the same, bit for bit, however it was come to: conversion begins at a frame of the source that is a
-/// multiple of p, on which a frame of the result stands, so that the phases are those of every other run; and as far
-/// ahead of the frame that is wanted as the conversion reaches.
+/// A frame is the same, bit for bit, however it is reached: conversion begins at a source frame that is a multiple of
+/// p, where a result frame coincides with it, so the phases are those of any other run; and it begins as far ahead of
+/// the wanted frame as the conversion reaches.
 class ResamplingDecoder final : public AudioDecoder {
 public:
-    /// The source stays the caller's, and must be brought to its place again by whoever reads it after this. Frames are
-    /// 32-bit floats of `channels` channels, mixed ahead of the conversion (FrameConverter). The resampler is one of
-    /// that many channels, from the source's rate to `rate`, both whole.
+    /// The caller keeps the source, and must seek it before reading from it again. Frames are 32-bit floats of
+    /// `channels` channels, mixed before the conversion (FrameConverter). The resampler has that many channels and
+    /// converts from the source's rate to `rate`, both whole.
     ResamplingDecoder(AudioDecoder& source, std::unique_ptr<Resampler> resampler, std::uint32_t channels,
                       std::uint32_t rate);
 
@@ -42,18 +41,18 @@ private:
     StreamDescription frameFormat_;
     std::uint64_t p_, q_;
     std::uint64_t frameCount_ = 0;
-    std::uint64_t lead_ = 0; // periods of q frames that the conversion begins ahead of what is wanted
+    std::uint64_t lead_ = 0; // periods of q frames converted ahead of the wanted frame
 
     FrameConverter converter_;
-    std::vector<std::byte> raw_; // as the source gives them
-    std::vector<float> piece_;   // as the resampler takes them
+    std::vector<std::byte> raw_; // frames from the source
+    std::vector<float> piece_;   // frames for the resampler
     std::vector<float> dropped_;
     std::uint32_t pieceFrames_ = 0;
 
     std::uint64_t frame_ = 0;
-    bool isAtFrame_ = false;    // `frame_` is the next to come out, behind the frames to drop
-    std::uint64_t silence_ = 0; // frames of it to take ahead of the source's next
-    std::uint64_t toDrop_ = 0;  // frames to come out ahead of `frame_`
+    bool isAtFrame_ = false;    // `frame_` is next, after the frames to drop
+    std::uint64_t silence_ = 0; // silent frames to feed before the source's next frame
+    std::uint64_t toDrop_ = 0;  // frames to discard before `frame_`
 };
 
 } // namespace platform

@@ -1,4 +1,4 @@
-// What the library finds in the module when it loads it: libebur128 behind the meter's interface.
+// The module's entry point: libebur128 behind the meter's interface.
 #include "media/loudness/LoudnessMeter.h"
 #include "platform/core/Export.h"
 #include "platform/core/Status.h"
@@ -23,14 +23,14 @@ constexpr int kModes = EBUR128_MODE_I | EBUR128_MODE_TRUE_PEAK;
 constexpr unsigned long kStepMilliseconds = 100;
 constexpr std::size_t kMomentarySteps = 4, kShortTermSteps = 30;
 constexpr double kNone = -std::numeric_limits<double>::infinity();
-constexpr double kAbsoluteGate = -70;  // LUFS; what is quieter counts nowhere
+constexpr double kAbsoluteGate = -70;  // LUFS; quieter sound is ignored everywhere
 constexpr double kRelativeGate = 0.01; // of the mean: -20 LU
 
-// WAVE's channel mask:
+// WAVE's channel mask.
 constexpr std::uint32_t kFrontLeft = 1U << 0, kFrontRight = 1U << 1, kFrontCenter = 1U << 2, kEffects = 1U << 3,
                         kBackLeft = 1U << 4, kBackRight = 1U << 5, kSideLeft = 1U << 9, kSideRight = 1U << 10;
 
-/// Where ITU-R BS.1770-4 has a speaker. Others than those of 5.1 and 7.1 weigh as the front does.
+/// Maps a speaker to its position in ITU-R BS.1770-4. Speakers outside 5.1 and 7.1 weigh like the front.
 channel placeOf(std::uint32_t speaker, std::uint32_t speakers)
 {
     const bool hasSides = (speakers & (kSideLeft | kSideRight)) != 0;
@@ -41,7 +41,7 @@ channel placeOf(std::uint32_t speaker, std::uint32_t speakers)
         return EBUR128_RIGHT;
     case kEffects:
         return EBUR128_UNUSED;
-    case kBackLeft: // the surrounds, where there are no others
+    case kBackLeft: // the surrounds, if there are no others
         return hasSides ? EBUR128_Mp135 : EBUR128_LEFT_SURROUND;
     case kBackRight:
         return hasSides ? EBUR128_Mm135 : EBUR128_RIGHT_SURROUND;
@@ -119,8 +119,8 @@ public:
     }
 
 private:
-    /// Each 100 ms: the means of the last 400 ms and 3 s are those of their steps, of which each is reckoned once.
-    /// False without memory.
+    /// Every 100 ms, computes the means of the last 400 ms and 3 s from step energies, each of which is computed once.
+    /// False if memory is short.
     bool endStep()
     {
         double step = kNone;
@@ -137,7 +137,7 @@ private:
         }
         return true;
     }
-    /// The mean; 0 where there are not so many.
+    /// The mean of the last `count` steps; 0 if there are fewer.
     double energyOfLast(std::size_t count) const
     {
         double sum = 0;
@@ -145,8 +145,8 @@ private:
             sum += energies_[(steps_ - i) % energies_.size()];
         return sum / static_cast<double>(count);
     }
-    /// By EBU Tech 3342, of windows of 3 s that begin each 100 ms; libebur128 takes those that begin each second, the
-    /// fewest allowed, by which the range of what changes quickly may be off by several LU.
+    /// The range by EBU Tech 3342 over 3 s windows that begin every 100 ms. libebur128 uses windows that begin every
+    /// second, the fewest allowed, which may be off by several LU for sound that changes quickly.
     std::optional<double> range() const
     {
         std::vector<double> windows = shortTerms_;
@@ -164,7 +164,7 @@ private:
     State state_;
     std::size_t stepFrames_, frames_ = 0, steps_ = 0;
     std::array<double, kShortTermSteps> energies_{}; // of the last steps
-    std::vector<double> shortTerms_;                 // those above the gate
+    std::vector<double> shortTerms_;                 // of the windows above the gate
     double maxMomentary_ = kNone, maxShortTerm_ = kNone;
 };
 

@@ -1,5 +1,5 @@
-// Packets whose frames' numbers are known because everything ahead of them was decoded once: for files whose times are
-// too coarse to tell.
+// Packets whose frame numbers are known because everything before them was decoded once; for files whose timestamps are
+// too coarse to number frames.
 #pragma once
 
 #include <cstddef>
@@ -10,18 +10,18 @@ namespace platform::ffmpeg {
 
 struct Checkpoint {
     std::int64_t time = 0;     // of the packet
-    std::int64_t position = 0; // in the file; negative when it is not known
-    std::uint64_t frame = 0;   // the number of the first frame that comes out once it is sent
+    std::int64_t position = 0; // in the file; negative if unknown
+    std::uint64_t frame = 0;   // number of the first frame that comes out after it is sent
 };
 
-/// In the order of the file, and a bounded number of them: when they become many, every other one goes.
+/// In file order and bounded in number: when there are too many, every other one is dropped.
 class Checkpoints {
 public:
-    /// Keeps it when it is far enough behind the last.
+    /// Keeps it if it is far enough after the last.
     void offer(const Checkpoint& checkpoint);
-    /// The one of this packet; null when it is none.
+    /// The checkpoint of this packet; null if it has none.
     const Checkpoint* find(std::int64_t time, std::int64_t position) const;
-    /// How many lie at or before a frame.
+    /// Number of checkpoints at or before a frame.
     std::size_t countUpTo(std::uint64_t frame) const;
     const Checkpoint& operator[](std::size_t index) const { return all_[index]; }
 

@@ -19,7 +19,7 @@ std::unique_ptr<Codec> Codec::open(const AVCodecParameters& parameters, int nume
             status = kStatusOK;
             return codec;
         }
-    // FFmpeg 5.1 gives up on blocks of ordinary files.
+    // FFmpeg 5.1 fails on blocks of ordinary WavPack files.
     const auto openCodec = parameters.codec_id == AV_CODEC_ID_WAVPACK ? WavPackCodec::open : FFmpegCodec::open;
     return openCodec(parameters, numerator, denominator, padding, status);
 }

@@ -9,14 +9,14 @@
 
 namespace platform::ffmpeg {
 
-/// One thread, and nothing said. The frame that came out last stays until the next is asked for.
+/// Single-threaded and silent. The last frame stays valid until the next is requested.
 class Codec {
 public:
     /// Whether frames that a stream marks as padding come out too.
     enum class Padding { kept, dropped };
 
-    /// Of packets whose times are in `numerator / denominator` seconds; 0 / 1 leaves them as they are. Null, with the
-    /// status, without a decoder for the coding.
+    /// A decoder for packets whose times are in units of `numerator / denominator` seconds; 0 / 1 passes times through.
+    /// Null, with the status, if there is no decoder for the coding.
     static std::unique_ptr<Codec> open(const AVCodecParameters& parameters, int numerator, int denominator,
                                        Padding padding, std::int32_t& status);
 
@@ -26,19 +26,19 @@ public:
     Codec& operator=(const Codec&) = delete;
 
     virtual const AVFrame& frame() const = 0;
-    /// Bits of a sample ahead of coding; 0 where that is not known.
+    /// Bits per sample before coding; 0 if unknown.
     virtual int sourceBits() const = 0;
     virtual CodingProfile profile() const { return CodingProfile::unknown; }
-    /// Whether the frames are made of 1-bit sound, of eight bits each.
+    /// Whether each frame holds eight bits of 1-bit sound.
     virtual bool decodesDSD() const { return false; }
 
     enum class Result { frame, needsPacket, end, failed };
-    /// The next frame of the packets sent. After `failed`, which is one packet's, it goes on.
+    /// The next frame of the packets sent. `failed` concerns one packet; decoding continues after it.
     virtual Result receive() = 0;
     enum class Sent { taken, failed, outOfMemory };
-    /// Null: no packet follows. A packet that cannot be decoded has failed here or in receive().
+    /// Null ends the stream. A packet that cannot be decoded fails here or in receive().
     virtual Sent send(const AVPacket* packet) = 0;
-    /// Forgets everything sent.
+    /// Discards everything sent.
     virtual void flush() = 0;
 };
 

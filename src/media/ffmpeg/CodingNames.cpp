@@ -82,7 +82,7 @@ constexpr FileName files[] = {
     {"matroska,webm", fourCC("mkv ")},
 };
 
-/// Four characters of FFmpeg's name, for what has no name elsewhere.
+/// Four characters of FFmpeg's name, for formats without a name elsewhere.
 FourCC nameOf(std::string_view full)
 {
     char name[4] = {' ', ' ', ' ', ' '};
@@ -96,7 +96,7 @@ bool isLinearPCM(AVCodecID codec)
            codec != AV_CODEC_ID_PCM_MULAW;
 }
 
-/// FFmpeg's names say it: "pcm_f32be".
+/// Derives the format from FFmpeg's name, such as "pcm_f32be".
 void setLinearPCM(StreamDescription& format, AVCodecID codec)
 {
     const std::string_view name = avcodec_get_name(codec);
@@ -136,7 +136,7 @@ std::uint64_t framesOfBlocks(const AVCodecParameters& parameters, int bytes)
                           codec == AV_CODEC_ID_ADPCM_IMA_QT || codec == AV_CODEC_ID_GSM_MS || isCompanded;
     if (!isBlocks && !isLinearPCM(codec))
         return 0;
-    AVCodecParameters copy = parameters; // which the query wants changeable
+    AVCodecParameters copy = parameters; // the query takes a non-const pointer
     const int frames = av_get_audio_frame_duration2(&copy, bytes);
     return frames > 0 ? static_cast<std::uint64_t>(frames) : 0;
 }

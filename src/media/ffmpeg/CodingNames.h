@@ -1,4 +1,4 @@
-// The system's names of codings and files beside FFmpeg's.
+// Maps FFmpeg's codings and files to the system's names.
 #pragma once
 
 #include "media/samples/SoundFacts.h"
@@ -10,27 +10,26 @@ struct AVCodecParameters;
 
 namespace platform::ffmpeg {
 
-/// FFmpeg's number of a coding whose packets the library finds itself; 0 when there is none.
+/// FFmpeg's id of a coding whose packets the library finds itself; 0 if there is none.
 int codecIdOf(FourCC formatId);
 
-/// How a stream's audio is coded, of samples of `sourceBits` bits (0 where that is not known).
+/// How a stream's audio is coded, from samples of `sourceBits` bits (0 if unknown).
 StreamDescription fileFormatOf(const AVCodecParameters& parameters, int sourceBits, double sampleRate,
                                std::uint32_t channels);
 
-/// The frames of one packet of `bytes` bytes, for codings whose blocks are all of one size and say nothing of each
-/// other; else 0.
+/// Frames per packet of `bytes` bytes, for codings with independent blocks of one size; else 0.
 std::uint64_t framesOfBlocks(const AVCodecParameters& parameters, int bytes);
 
-/// Of FFmpeg's numbers of a coding (an AVCodecID) and its profile.
+/// Takes FFmpeg's AVCodecID and profile.
 CodingProfile profileOf(int codec, int profile);
-/// Whether a coding, an AVCodecID, is one of bits, of which the decoder makes PCM of an eighth of their rate.
+/// Whether the coding, an AVCodecID, is 1-bit sound, from which the decoder makes PCM at an eighth of the rate.
 bool isDSD(int codec);
 
-/// "flac", "WAVE", …, after the name of a demultiplexer and, in movies, the brand; four characters of the
-/// demultiplexer's name for files that have no name elsewhere. `codec` is an AVCodecID.
+/// "flac", "WAVE", …, from the demultiplexer's name and, in movies, the brand; four characters of the demultiplexer's
+/// name for files without a name elsewhere. `codec` is an AVCodecID.
 FourCC fileTypeOf(std::string_view demuxer, std::string_view brand, int codec);
 
-/// The demultiplexers that may be used, apart by commas: files of sound or of pictures with sound, which name no other
+/// The allowed demultiplexers, separated by commas: files of sound, or of pictures with sound, that refer to no other
 /// files.
 extern const char* const usedDemuxers;
 

@@ -1,4 +1,4 @@
-// What hybrid WavPack files keep beside themselves, to be lossless.
+// The file that makes a hybrid WavPack file lossless.
 #pragma once
 
 #include "media/ffmpeg/Demuxer.h"
@@ -9,22 +9,22 @@
 
 namespace platform::ffmpeg {
 
-/// The file "x.wvc" beside "x.wv", whose packets go with those of the same times.
+/// The file "x.wvc" beside "x.wv". Its packets belong to those with the same times.
 class CorrectionFile {
 public:
-    /// Null where there is none that can be read, or where `packets` are not those of a WavPack file.
+    /// Null if there is none that can be read, or if `packets` are not those of a WavPack file.
     static std::unique_ptr<CorrectionFile> beside(const std::string& path, const Demuxer& packets);
 
-    /// Gives a packet what goes with it, in `opaque_ref`; nothing where nothing does.
+    /// Attaches the matching correction to a packet in `opaque_ref`, if there is one.
     void attachTo(AVPacket& packet);
-    /// To where the packets of `time` and behind are found.
+    /// Moves to the packets from `time` on.
     void seek(std::int64_t time);
 
 private:
     explicit CorrectionFile(Demuxer demuxer);
 
     Demuxer demuxer_;
-    Packet next_; // of the corrections; empty before it is read
+    Packet next_; // the next correction; empty until it is read
 };
 
 } // namespace platform::ffmpeg

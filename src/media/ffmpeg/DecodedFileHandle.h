@@ -1,4 +1,4 @@
-// What callers get to see of a file that a decoder owns: its properties.
+// The properties of a file that a decoder owns, as callers see them.
 #pragma once
 
 #include "media/userdata/AudioFileService.h"
@@ -7,7 +7,7 @@
 
 namespace platform::ffmpeg {
 
-/// Answers with the type, the format and the number of packets, where that is known; takes no property.
+/// Answers with type, format and number of packets, if known; no property can be set.
 class DecodedFileHandle final : public AudioHandle {
 public:
     static constexpr std::uint64_t unknownCount = ~std::uint64_t{0};

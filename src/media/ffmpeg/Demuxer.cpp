@@ -17,22 +17,22 @@ namespace platform::ffmpeg {
 
 namespace {
 
-/// EINVAL is what a demultiplexer that is not to be used gives.
+/// EINVAL means that the demultiplexer is not allowed.
 std::int32_t statusOf(int error)
 {
     const bool isSystemError = error > -4096 && error != AVERROR(EINVAL);
     return isSystemError ? PosixErrorToOSErr(AVUNERROR(error)) : AudioHandle::kFormatNotSupported;
 }
 
-/// A kind that bytes by chance look like a little is taken only when the file's name says the same.
+/// Formats that random bytes may resemble are accepted only if the file's name agrees.
 bool isCredible(const AVFormatContext& context, const std::string& url)
 {
     return context.probe_score >= AVPROBE_SCORE_RETRY ||
            (context.iformat->extensions != nullptr && av_match_ext(url.c_str(), context.iformat->extensions) != 0);
 }
 
-/// A context without a word: the log raises a message's level by the number that the class of its context points to,
-/// which of demultiplexers is none; here it is what `opaque` holds. The level itself is the host's.
+/// Makes a context that logs nothing. The log raises a message's level by a number to which the class of its context
+/// points; demultiplexers have none, so the class here points at `opaque`. The level itself belongs to the host.
 AVFormatContext* makeSilentContext()
 {
     static const AVClass silent = [] {
@@ -53,8 +53,8 @@ bool isAudio(const AVStream& stream)
     return stream.codecpar->codec_type == AVMEDIA_TYPE_AUDIO;
 }
 
-/// The first stream of audio that there is a decoder for, as readers of packets take it, and not the one that FFmpeg
-/// likes best; -1 without one.
+/// The first audio stream that has a decoder, as packet readers choose it, rather than the one that FFmpeg prefers; -1
+/// if there is none.
 int firstAudioStream(const AVFormatContext& context)
 {
     for (unsigned i = 0; i < context.nb_streams; ++i) {
@@ -66,7 +66,7 @@ int firstAudioStream(const AVFormatContext& context)
     return -1;
 }
 
-/// avformat_find_stream_info, with silent decoders for the streams that are known by now.
+/// avformat_find_stream_info with silent decoders for the streams known so far.
 int findStreamInfo(AVFormatContext& context)
 {
     std::vector<AVDictionary*> options(context.nb_streams);
@@ -94,7 +94,7 @@ std::int32_t Demuxer::open()
     if (av_dict_set(&options, "protocol_whitelist", "file", 0) < 0 ||
         av_dict_set(&options, "format_whitelist", usedDemuxers, 0) < 0)
         throw std::bad_alloc();
-    AVFormatContext* context = made.release(); // which is freed when it cannot be opened
+    AVFormatContext* context = made.release(); // freed by avformat_open_input when it fails
     int result = avformat_open_input(&context, url_.c_str(), nullptr, &options);
     av_dict_free(&options);
     if (result < 0)
@@ -158,7 +158,7 @@ bool Demuxer::read(AVPacket& packet, std::int32_t& status)
         else
             ++failures;
     }
-    const int error = context_->pb != nullptr ? context_->pb->error : 0; // which the end may hide
+    const int error = context_->pb != nullptr ? context_->pb->error : 0; // the end of the file may hide it
     if (error < 0 && error != AVERROR_EOF)
         status = statusOf(error);
     return false;

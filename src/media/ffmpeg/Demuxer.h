@@ -1,4 +1,4 @@
-// The packets of a file's audio as FFmpeg finds them.
+// The packets of a file's audio, as FFmpeg finds them.
 #pragma once
 
 #include "media/ffmpeg/Handles.h"
@@ -12,30 +12,31 @@ struct AVStream;
 
 namespace platform::ffmpeg {
 
-/// Owns the file, and takes nothing from any other, nor from a network.
+/// Owns the file. Opens no other file and no network connection.
 class Demuxer {
 public:
-    /// isOpen() is false afterwards, with the status, when no audio is found that there is a decoder for.
+    /// If no audio is found that has a decoder, isOpen() is false and `status` says why.
     Demuxer(const char* path, std::int32_t& status);
 
     bool isOpen() const { return context_ != nullptr; }
     const AVStream& stream() const;
-    /// Streams of audio, of which stream() is the first that can be decoded.
+    /// Number of audio streams; stream() is the first that can be decoded.
     unsigned audioStreams() const;
     unsigned streams() const;
     std::string_view name() const;
-    /// What a movie says of its kind; else empty.
+    /// The brand of a movie; else empty.
     std::string_view brand() const;
-    /// False at the end, where the file is broken beyond a hundred tries, and where it cannot be read, with the status.
+    /// False at the end, after a hundred failed attempts in a damaged file, and if the file cannot be read, with the
+    /// status.
     bool read(AVPacket& packet, std::int32_t& status);
-    /// To a packet at or before a time, in the stream's units, as well as the file lets it be found.
+    /// Seeks to a packet at or before a time in the stream's units, as precisely as the file allows.
     bool seek(std::int64_t time);
-    /// Bytes of the file itself, up to `count`, at most 4,096, fewer only at its end; the packets go on where they
-    /// were. 0, or the status of a read that failed.
+    /// Reads up to `count` bytes of the file itself, at most 4,096, fewer only at its end; the position of packets is
+    /// unchanged. 0, or the status of a failed read.
     std::int32_t readAt(std::uint64_t position, std::byte* to, std::size_t count, std::size_t& got);
-    /// The file's length in bytes; 0 when it cannot be told.
+    /// Length of the file in bytes; 0 if unknown.
     std::uint64_t size() const;
-    /// To the first packet, in the state of a newly opened file.
+    /// Returns to the first packet, in the state of a newly opened file.
     std::int32_t restart();
 
 private:

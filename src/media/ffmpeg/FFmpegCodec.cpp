@@ -16,9 +16,9 @@ namespace platform::ffmpeg {
 
 namespace {
 
-/// The one that is right, where there are several. Layers I to III: floats, as integers are dithered, differently after
-/// every seek. Others: the libraries of the codings' makers. FFmpeg's own decoder of Opus is off by up to -33 dB, that
-/// of GSM wraps where it should clip, that of Speex leaves the enhancement out.
+/// The accurate decoder where there are several. Layers I to III: to floats, because integers are dithered, differently
+/// after every seek. Others: the libraries of the codings' authors, since FFmpeg's own Opus decoder is off by up to -33
+/// dB, that for GSM wraps instead of clipping, and that for Speex omits the enhancement.
 const char* preferredDecoder(AVCodecID coding)
 {
     switch (coding) {
@@ -69,9 +69,9 @@ std::unique_ptr<Codec> FFmpegCodec::open(const AVCodecParameters& parameters, in
     context->pkt_timebase = {numerator, denominator};
     context->log_level_offset = kLogLevelOffset;
     if (parameters.codec_id == AV_CODEC_ID_OPUS)
-        context->request_sample_fmt = AV_SAMPLE_FMT_FLT; // libopus would round to 16 bits
+        context->request_sample_fmt = AV_SAMPLE_FMT_FLT; // otherwise libopus rounds to 16 bits
     if (isLossless(parameters.codec_id))
-        context->err_recognition = AV_EF_CRCCHECK | AV_EF_EXPLODE; // what is not as it was is none of the sound
+        context->err_recognition = AV_EF_CRCCHECK | AV_EF_EXPLODE; // damaged data is no sound
     if (padding == Padding::kept)
         context->flags2 |= AV_CODEC_FLAG2_SKIP_MANUAL;
     if (avcodec_open2(context.get(), codec, nullptr) < 0)

@@ -20,13 +20,13 @@ namespace platform::ffmpeg {
 
 namespace {
 
-/// For codings that build on what went before; 13 packets of MP3, four times what Opus asks for.
+/// Frames decoded ahead for codings that depend on earlier packets: 13 packets of MP3; four times what Opus asks for.
 constexpr std::uint64_t kWarmUp = 16384, kOpusWarmUp = 96000;
-/// Decoding so far costs less than finding a place in a file.
+/// Decoding this far costs less than seeking.
 constexpr std::uint64_t kReach = 32768;
-/// More than any coding makes of one byte: FLAC has 16 bytes and more for at most 65,535 frames.
+/// More frames than any coding makes of one byte: FLAC has at least 16 bytes for up to 65,535 frames.
 constexpr std::uint64_t kFramesPerByte = 8192;
-/// Times beyond are none.
+/// Larger times are invalid.
 constexpr std::uint64_t kMostFrames = std::uint64_t{1} << 62;
 
 template <std::size_t N>
@@ -35,7 +35,7 @@ bool isOneOf(std::string_view name, const std::array<std::string_view, N>& names
     return std::find(names.begin(), names.end(), name) != names.end();
 }
 
-/// Demultiplexers whose times are those that the file states for each place in it.
+/// Demultiplexers whose timestamps are those that the file states for each place.
 bool hasExactTimes(const Demuxer& demuxer)
 {
     constexpr std::array<std::string_view, 6> exact{"flac", "ogg", "tta", "wv", "ape", "tak"};
@@ -44,7 +44,7 @@ bool hasExactTimes(const Demuxer& demuxer)
            stream.time_base.den == stream.codecpar->sample_rate;
 }
 
-/// Demultiplexers that cut one run of bytes into packets.
+/// Demultiplexers that split one run of bytes into packets.
 bool isOneRun(const Demuxer& demuxer)
 {
     constexpr std::array<std::string_view, 6> runs{"wav", "w64", "aiff", "au", "caf", "ircam"};
@@ -56,7 +56,7 @@ std::uint64_t framesPerBlockOf(const AVCodecParameters& parameters)
     return parameters.block_align > 0 ? framesOfBlocks(parameters, parameters.block_align) : 0;
 }
 
-/// Every packet decodes to a frame, without delay, and all of these are of one length, but where the stream changes.
+/// Codings in which each packet decodes to one frame without delay, all of one length unless the stream changes.
 bool hasConstantPackets(AVCodecID coding)
 {
     constexpr std::array constant{AV_CODEC_ID_MP1,    AV_CODEC_ID_MP2,   AV_CODEC_ID_MP3,      AV_CODEC_ID_AC3,
@@ -65,10 +65,10 @@ bool hasConstantPackets(AVCodecID coding)
     return std::ranges::find(constant, coding) != constant.end();
 }
 
-/// Every packet decodes by itself.
+/// Whether every packet decodes by itself.
 bool isIndependent(const AVCodecParameters& parameters)
 {
-    if (parameters.codec_id == AV_CODEC_ID_GSM_MS) // blocks of one size, each of which needs those ahead
+    if (parameters.codec_id == AV_CODEC_ID_GSM_MS) // blocks of one size, but each depends on those before it
         return false;
     constexpr int both = AV_CODEC_PROP_INTRA_ONLY | AV_CODEC_PROP_LOSSLESS;
     const AVCodecDescriptor* descriptor = avcodec_descriptor_get(parameters.codec_id);
@@ -102,12 +102,12 @@ FileDecoder::FileDecoder(Demuxer demuxer, std::unique_ptr<CorrectionFile> correc
     numbers_ = framesPerBlock_ > 0 ? Numbers::byPosition : hasExactTimes(demuxer_) ? Numbers::byTime : Numbers::byCount;
     isPaged_ = demuxer_.name() == "ogg";
     endsWithTime_ = isPaged_ && parameters.codec_id == AV_CODEC_ID_VORBIS;
-    // The low bits of "ima4" run on from the first packet to the last.
+    // The low bits of "ima4" predictors depend on all packets before.
     isChained_ = parameters.codec_id == AV_CODEC_ID_ADPCM_IMA_QT;
     warmUp_ = isIndependent(parameters) ? 0 : parameters.codec_id == AV_CODEC_ID_OPUS ? kOpusWarmUp : kWarmUp;
 }
 
-/// Everything as at the first packet, the decoder too, whatever it keeps when it is flushed.
+/// Resets to the first packet, with a new decoder, because flushing may not clear all of its state.
 std::int32_t FileDecoder::begin()
 {
     const AVRational unit = numbers_ == Numbers::byTime ? demuxer_.stream().time_base : AVRational{0, 1};
@@ -169,13 +169,13 @@ std::int32_t FileDecoder::describeAsDecoded()
     describe(fileType, file, *frames, lead, count, DecodedFileHandle::unknownCount);
     if (stated)
         noteChecksum(*stated, file.bitsPerChannel);
-    forget(); // whoever reads starts anew; whoever only asks does not pay for it
+    forget(); // the first read starts anew; a caller who only asks for facts does not pay for it
     return kStatusOK;
 }
 
-/// Where numbers are exact anywhere, those of the last frames tell, and where every packet has as many frames as the
-/// first, their number; else everything is decoded once. `first` are the frames decoded so far, 0 where these do not
-/// count.
+/// Counts the frames. If frames can be numbered anywhere, the last ones tell; if every packet has as many frames as the
+/// first, the number of packets does; otherwise everything is decoded once. `first` is the number of frames decoded so
+/// far, or 0 if they do not count.
 std::int32_t FileDecoder::countFrames(std::uint64_t first, std::uint64_t& count)
 {
     constexpr std::uint64_t tail = 1u << 16;
@@ -199,20 +199,20 @@ std::int32_t FileDecoder::countFrames(std::uint64_t first, std::uint64_t& count)
     if (status == kStatusOK && count == 0)
         status = countFromStart(count);
     if (status == kStatusOK && numbers_ == Numbers::byTime && count / kFramesPerByte > demuxer_.size()) {
-        numbers_ = Numbers::byCount; // the times are no times
+        numbers_ = Numbers::byCount; // the timestamps are invalid
         status = countFromStart(count);
     }
     if (endsWithTime_ && length > 0)
         count = std::min(count, length);
-    // Where the file states it, the sound ends within the last block, or ahead of padding to 8 bytes (Wave64).
+    // If the file states a length, the sound ends in the last block, or before padding to 8 bytes (Wave64).
     if (numbers_ == Numbers::byPosition && length < count && count - length < framesPerBlock_ + 8)
         count = length;
     isCounting_ = false;
     return status;
 }
 
-/// By the file's header, of kinds that have the length there; 0 elsewhere, and where it is only rounded otherwise or
-/// counts what primes a decoder.
+/// The length in the file's header, for kinds that have it; 0 for others, and if the excess is within rounding or
+/// within what primes a decoder.
 std::uint64_t FileDecoder::promisedFrames(std::uint64_t count, double sampleRate) const
 {
     if (musepack_)
@@ -232,8 +232,8 @@ std::uint64_t FileDecoder::promisedFrames(std::uint64_t count, double sampleRate
     return promised > count + tolerance ? promised : 0;
 }
 
-/// From the second packet on, which is the next; 0 where something says that packets differ. The last ones are decoded:
-/// one that is cut gives no frames.
+/// Counts packets, beginning with the second, which is the next. 0 if packets may differ. Decodes the last few, because
+/// a packet that is cut short yields no frames.
 std::int32_t FileDecoder::countPackets(std::uint64_t framesPerPacket, std::uint64_t& count)
 {
     constexpr std::size_t kLast = 4;
@@ -262,7 +262,7 @@ std::int32_t FileDecoder::countPackets(std::uint64_t framesPerPacket, std::uint6
     return kStatusOK;
 }
 
-/// The number behind the last frame that the last packets decode to; false where they have other numbers of frames.
+/// Sets the number after the last frame of the last packets; false if their frames have other lengths.
 bool FileDecoder::endOfLastPackets(std::span<const Packet> last, std::uint64_t framesPerPacket, std::uint64_t& count)
 {
     if (last.empty())
@@ -305,8 +305,8 @@ std::int32_t FileDecoder::decodeRest(std::uint64_t& end)
     }
 }
 
-/// The time of number 0, by the first frame that decodes. In a FLAC file that states its length times count from the
-/// first sample, whether its frame decodes or not.
+/// The time of frame 0, from the first frame that decodes. In a FLAC file that states its length, times count from the
+/// first sample even if its frame does not decode.
 std::int64_t FileDecoder::startOf(const AVFrame& frame) const
 {
     const bool countsFromZero = demuxer_.name() == "flac" && frame.pts < demuxer_.stream().duration;
@@ -328,7 +328,7 @@ std::uint64_t FileDecoder::reach(std::uint64_t)
 std::int32_t FileDecoder::startAt(std::uint64_t& number)
 {
     constexpr int attempts = 5;
-    const bool isWhole = demuxer_.isOpen() && codec_; // unless starting anew failed
+    const bool isWhole = demuxer_.isOpen() && codec_; // false if restarting failed
     bool hasLanded = isWhole && numbers_ == Numbers::byCount && landAtCheckpoint(number);
     const int tries = !isWhole || !canLand() || isChained_ ? 0 : attempts;
     std::uint64_t back = warmUp_;
@@ -342,8 +342,8 @@ std::int32_t FileDecoder::startAt(std::uint64_t& number)
     return restart();
 }
 
-/// What the demultiplexer has to be asked for. One that looks for blocks finds their place by the bit rate that the
-/// file states, which says little of ADPCM.
+/// The time to seek to. A demultiplexer that splits blocks finds them by the file's bit rate, which is unreliable for
+/// ADPCM.
 std::int64_t FileDecoder::timeOf(std::uint64_t number) const
 {
     const auto place = static_cast<std::int64_t>(number);
@@ -356,7 +356,7 @@ std::int64_t FileDecoder::timeOf(std::uint64_t number) const
                           AV_ROUND_DOWN);
 }
 
-/// Decodes from `back` frames before `number` on; false when frames come later than `needed` ahead of it.
+/// Seeks to `back` frames before `number` and decodes; false if the first frame is less than `needed` ahead of it.
 bool FileDecoder::land(std::uint64_t number, std::uint64_t back, std::uint64_t needed)
 {
     pending_.reset();
@@ -374,8 +374,8 @@ bool FileDecoder::land(std::uint64_t number, std::uint64_t back, std::uint64_t n
     return true;
 }
 
-/// The same by two checkpoints: where the first is met the decoder begins to know what it must, at the second numbers
-/// begin.
+/// As land(), with two checkpoints: at the first the decoder starts to build its state, at the second frames get their
+/// numbers.
 bool FileDecoder::landAtCheckpoint(std::uint64_t number)
 {
     const std::size_t before = checkpoints_.countUpTo(number);
@@ -406,8 +406,8 @@ std::int32_t FileDecoder::next(Span& span)
     return decodeNext(span);
 }
 
-/// Ogg states one time a page, and FFmpeg reckons the others from what it takes packets to last; of Vorbis it is wrong
-/// where long blocks become short ones. So there a frame tells only when it has the length that it was given.
+/// Ogg states one time per page, and FFmpeg derives the others from packet durations, which are wrong in Vorbis where
+/// short blocks follow long ones. Therefore a frame of Ogg has a number only if its length is its packet's duration.
 bool FileDecoder::tellsNumber(const AVFrame& frame) const
 {
     if (numbers_ == Numbers::byCount || frame.pts == AV_NOPTS_VALUE)
@@ -452,7 +452,7 @@ std::int32_t FileDecoder::decodeNext(Span& span)
     }
 }
 
-/// A packet has failed: where frames are counted, as many as the last one gave are missing.
+/// Skips a failed packet: if frames are counted, as many as in the last packet are missing.
 void FileDecoder::passOver()
 {
     if (numbers_ == Numbers::byCount && isNumbered_ && expected_ > 0)
@@ -475,14 +475,14 @@ std::int32_t FileDecoder::sendPacket()
     return sent != Codec::Sent::outOfMemory ? kStatusOK : kStatusOutOfMemory;
 }
 
-/// What the packet at hand tells of the numbers of its frames.
+/// Numbers the packet's frames, as far as the packet tells.
 void FileDecoder::numberPacket()
 {
     AVPacket& packet = *packet_;
     switch (numbers_) {
     case Numbers::byTime:
-        // In Ogg, times on the page that a seek leads to are reckoned from its end, which the last page may have cut
-        // short; from the next page on they follow from the one before.
+        // In Ogg, the times on the page that a seek leads to are derived from its end, which may be cut on the last
+        // page; those on the next page follow from the page before.
         if (isPaged_ && !isNumbered_ && (page_ < 0 || packet.pos == page_)) {
             page_ = packet.pos;
             packet.pts = AV_NOPTS_VALUE;

@@ -1,4 +1,4 @@
-// Decoding of files in which only FFmpeg finds its way: FLAC, Ogg, WMA and whatever else it knows.
+// Decodes files in which only FFmpeg finds its way: FLAC, Ogg, WMA and others.
 #pragma once
 
 #include "media/ffmpeg/Checkpoints.h"
@@ -19,11 +19,11 @@ public:
     static std::unique_ptr<FileDecoder> open(const char* path, std::int32_t& status);
 
 private:
-    /// Where the numbers of frames come from.
+    /// Source of the frame numbers.
     enum class Numbers {
-        byTime,     // times count frames; those of a run follow one from another, but for gaps
-        byPosition, // all packets are blocks of one size, one behind the other
-        byCount,    // what was decoded from the start on
+        byTime,     // timestamps count frames; a run is consecutive except for gaps
+        byPosition, // packets are consecutive blocks of one size
+        byCount,    // all frames from the start were decoded
     };
 
     FileDecoder(Demuxer demuxer, std::unique_ptr<CorrectionFile> corrections);
@@ -53,28 +53,28 @@ private:
     const AVFrame& decoded() const override { return codec_->frame(); }
 
     Demuxer demuxer_;
-    std::unique_ptr<CorrectionFile> corrections_; // null when there are none
-    std::optional<MusepackInfo> musepack_;        // of such files, where the header says it
+    std::unique_ptr<CorrectionFile> corrections_; // null if there are none
+    std::optional<MusepackInfo> musepack_;        // of such files, if the header has them
     std::unique_ptr<Codec> codec_;
     Packet packet_;
-    std::uint64_t sent_ = 0; // packets since the start
+    std::uint64_t sent_ = 0; // packets sent since the start
     Numbers numbers_ = Numbers::byCount;
-    std::int64_t base_ = 0;            // the time, or the position, of number 0
-    std::uint64_t framesPerBlock_ = 0; // of blocks of one size
-    bool isPaged_ = false;             // by Ogg
-    bool endsWithTime_ = false;        // the file states where the sound ends, and the last packet may go beyond
-    std::int64_t page_ = -1;           // the one that the last seek led to; negative before it is known
-    bool isChained_ = false;           // nothing decodes but from the start
-    std::uint64_t warmUp_ = 0;         // frames to decode and drop ahead of one
-    std::uint64_t limit_ = kNever;     // no frame lies there or behind
-    std::uint64_t expected_ = 0;       // the number of the next frame where nothing else tells it
-    std::uint64_t length_ = 0;         // of the last span
-    bool isNumbered_ = true;           // `expected_` holds; else frames are dropped
-    std::optional<Span> pending_;      // decoded, and to be handed out next
+    std::int64_t base_ = 0;            // time or position of frame 0
+    std::uint64_t framesPerBlock_ = 0; // for blocks of one size
+    bool isPaged_ = false;             // Ogg
+    bool endsWithTime_ = false;        // the file states where the sound ends; the last packet may go further
+    std::int64_t page_ = -1;           // the page that the last seek led to; negative until known
+    bool isChained_ = false;           // decoding must begin at the start
+    std::uint64_t warmUp_ = 0;         // frames to decode and drop before the wanted one
+    std::uint64_t limit_ = kNever;     // no frame has this number or a higher one
+    std::uint64_t expected_ = 0;       // number of the next frame, unless its packet tells
+    std::uint64_t length_ = 0;         // length of the last span
+    bool isNumbered_ = true;           // `expected_` is valid; otherwise frames are dropped
+    std::optional<Span> pending_;      // decoded already, returned next
     Checkpoints checkpoints_;
     bool isCounting_ = false;
-    std::size_t met_ = 0;        // checkpoints since the last seek
-    std::int64_t searchEnd_ = 0; // the time by which two must have been met
+    std::size_t met_ = 0;        // checkpoints met since the last seek
+    std::int64_t searchEnd_ = 0; // time by which two must have been met
     bool hasGivenUp_ = false;    // they were not
 };
 

@@ -15,7 +15,7 @@ namespace {
 
 using Flag = StreamDescription::Flag;
 
-/// 24 bits of a sample, which stand at the top of a 32-bit integer, in the processor's byte order.
+/// A 24-bit sample at the top of a 32-bit integer, in the processor's byte order.
 struct Int24 {
     std::array<std::byte, 3> bytes;
 };
@@ -25,7 +25,7 @@ template <class To, class From>
 To sampleOf(From from)
 {
     if constexpr (sizeof(From) == 1) {
-        return static_cast<To>((int{from} - 128) * 256); // decoders give unsigned bytes
+        return static_cast<To>((int{from} - 128) * 256); // decoders deliver unsigned bytes
     } else if constexpr (sizeof(To) == 3) {
         constexpr std::size_t low = std::endian::native == std::endian::little ? 1 : 0;
         Int24 to;
@@ -67,14 +67,14 @@ void copyFrames(const AVFrame& frame, std::uint64_t first, std::size_t count, st
         copyChannel(channel(have == 1 ? 0 : c), isPlanar ? 1 : have, samples + c, channels, count);
 }
 
-/// What the samples of a decoder become; bits 0 when they become nothing.
+/// Output format for a decoder's samples; 0 bits if they are not supported.
 SampleFormat sampleFormatOf(AVSampleFormat format, int sourceBits)
 {
     switch (av_get_packed_sample_fmt(format)) {
     case AV_SAMPLE_FMT_U8:
     case AV_SAMPLE_FMT_S16:
         return {.bits = 16};
-    case AV_SAMPLE_FMT_S32: // samples of fewer bits stand at the top
+    case AV_SAMPLE_FMT_S32: // samples of fewer bits are left-aligned
         return {.bits = sourceBits > 0 && sourceBits <= 24 ? 24 : 32};
     case AV_SAMPLE_FMT_FLT:
         return {.bits = 32, .isFloat = true};
@@ -111,7 +111,7 @@ std::optional<StreamDescription> frameFormatOf(int sourceBits, const AVFrame& fr
 
 std::uint32_t speakersOf(const AVFrame& frame)
 {
-    constexpr std::uint64_t inWAVE = 0x3FFFF; // which number them alike
+    constexpr std::uint64_t inWAVE = 0x3FFFF; // bits that both masks number alike
     const AVChannelLayout& layout = frame.ch_layout;
     return layout.order == AV_CHANNEL_ORDER_NATIVE && (layout.u.mask & ~inWAVE) == 0
                ? static_cast<std::uint32_t>(layout.u.mask)

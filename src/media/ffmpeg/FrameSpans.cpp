@@ -8,7 +8,7 @@ void FrameSpans::add(std::uint64_t start, std::uint64_t end)
 {
     if (start >= end)
         return;
-    // Those that it touches become one with it.
+    // Spans that it touches are merged with it.
     const auto first = std::lower_bound(all_.begin(), all_.end(), start,
                                         [](const Span& span, std::uint64_t value) { return span.end < value; });
     auto last = first;

@@ -1,4 +1,4 @@
-// Frames of a file, as the spans that they make.
+// A set of frames, kept as spans.
 #pragma once
 
 #include <cstdint>
@@ -6,10 +6,10 @@
 
 namespace platform::ffmpeg {
 
-/// Apart, and in order. Each frame counts once, however often it is added.
+/// Disjoint and sorted. Each frame counts once, however often it is added.
 class FrameSpans {
 public:
-    /// From `start` on, to ahead of `end`.
+    /// Adds the frames [start, end).
     void add(std::uint64_t start, std::uint64_t end);
     std::uint64_t count() const { return count_; }
 

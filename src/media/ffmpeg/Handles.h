@@ -1,4 +1,4 @@
-// What FFmpeg allocates, owned.
+// Owners of what FFmpeg allocates.
 #pragma once
 
 #include <memory>
@@ -25,8 +25,8 @@ using FormatContext = std::unique_ptr<AVFormatContext, Release>;
 using Frame = std::unique_ptr<AVFrame, Release>;
 using Packet = std::unique_ptr<AVPacket, Release>;
 
-/// Takes a message of a context beyond every level: a host may show what its own contexts say. The log looks at the low
-/// 8 bits, and FFmpeg adds up to 127 itself.
+/// Raises a context's messages beyond every level, because a host may show those of its own contexts. The log uses the
+/// low 8 bits, and FFmpeg itself adds up to 127.
 constexpr int kLogLevelOffset = 64;
 
 // These throw std::bad_alloc.

@@ -13,7 +13,7 @@ namespace platform::ffmpeg {
 
 namespace {
 
-constexpr std::size_t kHead = 4, kGroup = 4; // bytes of each channel: at the block's start, and of 8 samples
+constexpr std::size_t kHead = 4, kGroup = 4; // bytes per channel: head of a block, and a group of 8 samples
 
 constexpr std::array<std::int16_t, 89> kSteps{
     7,    8,     9,     10,    11,    12,    13,    14,    16,    17,    19,    21,    23,    25,   28,
@@ -78,7 +78,7 @@ Codec::Result IMACodec::receive()
         return isEnd_ ? Result::end : Result::needsPacket;
     const std::size_t size = std::min(blockSize_, static_cast<std::size_t>(packet_->size) - at_);
     const bool isDecoded = decode(packet_->data + at_, size);
-    frame_->pts = at_ == 0 ? packet_->pts : AV_NOPTS_VALUE; // those behind it follow
+    frame_->pts = at_ == 0 ? packet_->pts : AV_NOPTS_VALUE; // later ones follow from it
     at_ += size;
     if (at_ >= static_cast<std::size_t>(packet_->size))
         av_packet_unref(packet_.get());

@@ -1,4 +1,4 @@
-// IMA ADPCM as WAVE holds it, by the algorithm that was published.
+// IMA ADPCM as in WAVE, decoded by the published algorithm.
 #pragma once
 
 #include "media/ffmpeg/Codec.h"
@@ -8,12 +8,12 @@
 
 namespace platform::ffmpeg {
 
-/// Blocks of 4 bits a sample (IMA Digital Audio Focus and Technical Working Groups, "Recommended Practices for
-/// Enhancing Digital Audio Compatibility in Multimedia Systems", 1992). FFmpeg rounds the difference of two samples
-/// once where the algorithm rounds each of its terms, and so drifts away from what the encoder had.
+/// Blocks of 4-bit samples (IMA Digital Audio Focus and Technical Working Groups, "Recommended Practices for Enhancing
+/// Digital Audio Compatibility in Multimedia Systems", 1992). FFmpeg rounds the difference of two samples once, where
+/// the algorithm rounds each of its terms, and so drifts away from the encoder.
 class IMACodec final : public Codec {
 public:
-    /// As Codec::open; null, without a status, for blocks of another kind.
+    /// As Codec::open; null, without a status, for other blocks.
     static std::unique_ptr<Codec> open(const AVCodecParameters& parameters);
 
     const AVFrame& frame() const override { return *frame_; }
@@ -28,7 +28,7 @@ private:
 
     std::size_t channels_, blockSize_;
     int sampleRate_;
-    Packet packet_; // whose blocks from `at_` on are to be decoded; empty when there are none
+    Packet packet_; // blocks from `at_` on are still to be decoded; empty if there are none
     std::size_t at_ = 0;
     Frame frame_;
     bool isEnd_ = false;

@@ -1,4 +1,4 @@
-// What the library finds in the module when it loads it.
+// The module's entry point.
 #include "media/decoding/DecoderModule.h"
 #include "media/ffmpeg/FileDecoder.h"
 #include "media/ffmpeg/PacketDecoder.h"
@@ -12,7 +12,7 @@ namespace {
 
 using namespace platform;
 
-/// Nothing is thrown across the module's border.
+/// Keeps exceptions from crossing the module's border.
 template <typename Make>
 auto guarded(std::int32_t* status, Make make) -> decltype(make().release())
 {

@@ -11,8 +11,8 @@ namespace platform::ffmpeg {
 
 namespace {
 
-/// Seven bits of a number in each byte, the highest first, all but the last marked; none beyond 63 bits, and where the
-/// bytes end. Drops what it took.
+/// Takes a number of 7 bits per byte, highest first, all bytes but the last marked; none beyond 63 bits or if the bytes
+/// end.
 std::optional<std::uint64_t> takeNumber(BytesView& bytes)
 {
     constexpr std::size_t most = 9;
@@ -28,7 +28,7 @@ std::optional<std::uint64_t> takeNumber(BytesView& bytes)
     return {};
 }
 
-/// The body of "SH": checksum, version, frames, silence ahead of them.
+/// Parses the body of "SH": checksum, version, frames, silence ahead of them.
 std::optional<MusepackInfo> infoOf(BytesView body)
 {
     constexpr std::size_t fixedSize = 5, versionAt = 4;
@@ -42,7 +42,7 @@ std::optional<MusepackInfo> infoOf(BytesView body)
     return MusepackInfo{.lead = delay + *silence, .frames = *frames - *silence};
 }
 
-/// Where an ID3v2 tag (id3.org, 2.4.0) at the start ends; 0 without one.
+/// Where an ID3v2 tag (id3.org, 2.4.0) at the start ends; 0 if there is none.
 std::uint64_t endOfTag(BytesView start)
 {
     constexpr std::size_t headerSize = 10, flagsAt = 5, sizeAt = 6;
@@ -59,13 +59,13 @@ std::uint64_t endOfTag(BytesView start)
 
 std::int32_t readMusepackInfo(Demuxer& demuxer, std::optional<MusepackInfo>& info)
 {
-    constexpr int mostPackets = 16; // ahead of the header, which should be the first
+    constexpr int mostPackets = 16; // before the header, which should be the first
     constexpr std::size_t keySize = 2;
     info.reset();
     if (demuxer.name() != "mpc8")
         return kStatusOK;
     std::array<std::byte, 32> bytes;
-    std::int32_t status = kStatusOK; // behind a read that failed nothing is found
+    std::int32_t status = kStatusOK; // after a failed read nothing is found
     const auto at = [&](std::uint64_t position) {
         std::size_t got = 0;
         if (status == kStatusOK)

@@ -1,5 +1,5 @@
 // Where the sound of a Musepack file begins and ends, which its packets do not tell. Published source: the format
-// description of stream version 8 by the coding's makers.
+// description of stream version 8 by the coding's authors.
 #pragma once
 
 #include <cstdint>
@@ -10,12 +10,12 @@ namespace platform::ffmpeg {
 class Demuxer;
 
 struct MusepackInfo {
-    std::uint64_t lead = 0;   // frames that decoding gives ahead of the first: the filter bank's delay, and silence
+    std::uint64_t lead = 0;   // frames decoded before the first: the filter bank's delay, and silence
     std::uint64_t frames = 0; // at least 1
 };
 
-/// Of a file of stream version 8, a tag ahead of it or not; none for others, and where the header does not say. 0, or
-/// the status of a read that failed.
+/// Reads a file of stream version 8, with or without a tag before it; none for others, and if the header does not tell.
+/// 0, or the status of a failed read.
 std::int32_t readMusepackInfo(Demuxer& demuxer, std::optional<MusepackInfo>& info);
 
 } // namespace platform::ffmpeg

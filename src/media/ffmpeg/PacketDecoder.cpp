@@ -17,7 +17,7 @@ namespace platform::ffmpeg {
 
 namespace {
 
-/// What the decoder wants ahead of the packets, in its own form.
+/// Passes the decoder its configuration in the form that it expects.
 void setCookie(AVCodecParameters& parameters, BytesView cookie)
 {
     constexpr std::size_t alacHead = 12, maxCookie = 1u << 20; // an atom's head: size, "alac", version and flags
@@ -93,13 +93,13 @@ PacketDecoder::PacketDecoder(std::unique_ptr<PacketSource> source, CodecParamete
 {
 }
 
-/// What only decoding tells: the samples' kind and the channels.
+/// Sets what only decoding tells: sample format and channels.
 std::int32_t PacketDecoder::describeAsDecoded()
 {
     StreamDescription file = source_->format();
     SoundFacts facts = source_->facts();
     StreamDescription frames = nativePCM(file.sampleRate, file.channelsPerFrame, {.bits = 32, .isFloat = true});
-    if (table_.validFrames > 0) { // else there is nothing to read, which is no fault
+    if (table_.validFrames > 0) { // otherwise there is nothing to read, which is no error
         Span span;
         if (const std::int32_t status = next(span); status != kStatusOK)
             return status;
@@ -110,7 +110,7 @@ std::int32_t PacketDecoder::describeAsDecoded()
             return AudioHandle::kFormatNotSupported;
         facts.speakers = speakersOf(decoded());
         frames = *found;
-        if (static_cast<std::uint64_t>(decoded().nb_samples) > framesPerPacket_) // AAC of twice the rate that is stated
+        if (static_cast<std::uint64_t>(decoded().nb_samples) > framesPerPacket_) // AAC at twice the stated rate
             return AudioHandle::kFormatNotSupported;
         frames.sampleRate = file.sampleRate;
         file.channelsPerFrame = frames.channelsPerFrame;
@@ -138,7 +138,7 @@ std::int32_t PacketDecoder::startAt(std::uint64_t& number)
     std::int32_t status = kStatusOK;
     sent_ = awaited_ = packet < source_->packetCount() ? packet - std::min(source_->preRoll(packet), packet) : packet;
     number = std::min(number, awaited_ * framesPerPacket_);
-    // Nothing is dropped ahead of the first packet, and a flushed decoder still knows the shape of its last window.
+    // Nothing is dropped before the first packet, and flushing a decoder does not reset the shape of its last window.
     if (awaited_ == 0 || !codec_)
         codec_ = openCodec(*parameters_, status);
     else
@@ -154,7 +154,7 @@ std::uint64_t PacketDecoder::reach(std::uint64_t number)
 
 std::int32_t PacketDecoder::sendPacket()
 {
-    std::int32_t status = kStatusEndOfFile; // also where the file has fewer packets than it says
+    std::int32_t status = kStatusEndOfFile; // also if the file has fewer packets than it says
     if (sent_ < source_->packetCount())
         status = source_->read(sent_, bytes_);
     if (status == kStatusEndOfFile)
@@ -162,8 +162,8 @@ std::int32_t PacketDecoder::sendPacket()
     if (status != kStatusOK)
         return status;
     const std::size_t size = bytes_.size();
-    const auto pts = static_cast<std::int64_t>(sent_++); // the decoder hands it on to the frame
-    if (size == 0 || size > std::size_t{1} << 24)        // an empty packet would be the end
+    const auto pts = static_cast<std::int64_t>(sent_++); // the decoder copies it to the frame
+    if (size == 0 || size > std::size_t{1} << 24)        // an empty packet would mean the end
         return kStatusOK;
     bytes_.resize(size + AV_INPUT_BUFFER_PADDING_SIZE);
     std::fill(bytes_.begin() + static_cast<std::ptrdiff_t>(size), bytes_.end(), std::byte{0});
@@ -182,7 +182,7 @@ std::int32_t PacketDecoder::next(Span& span)
             const AVFrame& frame = decoded();
             const bool isNew =
                 frame.pts != AV_NOPTS_VALUE && frame.pts >= 0 && static_cast<std::uint64_t>(frame.pts) >= awaited_;
-            if (!isNew || frame.nb_samples <= 0) // more frames of a packet than it may have
+            if (!isNew || frame.nb_samples <= 0) // more frames than the packet may have
                 break;
             const auto packet = static_cast<std::uint64_t>(frame.pts);
             awaited_ = packet + 1;

@@ -1,4 +1,4 @@
-// Decoding of packets that the library found itself.
+// Decodes packets that the library found itself.
 #pragma once
 
 #include "media/ffmpeg/Codec.h"
@@ -9,8 +9,8 @@
 
 namespace platform::ffmpeg {
 
-/// The frames of packet p are the numbers from p x framesPerPacket on, whatever the decoder makes of it: a packet that
-/// does not decode is silence, one of other frames is cut or filled up.
+/// Packet p always has the frames from p x framesPerPacket on: a packet that does not decode becomes silence, and one
+/// of another length is cut or filled up.
 class PacketDecoder final : public SpanDecoder {
 public:
     static std::unique_ptr<PacketDecoder> open(std::unique_ptr<PacketSource> source, std::int32_t& status);
@@ -34,8 +34,8 @@ private:
     Bytes bytes_;
     PacketTable table_;
     std::uint64_t framesPerPacket_ = 0;
-    std::uint64_t sent_ = 0;    // packets before this one went to the decoder, or were passed over
-    std::uint64_t awaited_ = 0; // no frame of this packet, or of a later one, came out yet
+    std::uint64_t sent_ = 0;    // all earlier packets were sent or skipped
+    std::uint64_t awaited_ = 0; // no frame of this packet or a later one came out yet
 };
 
 /// As DecoderModule::openPackets.

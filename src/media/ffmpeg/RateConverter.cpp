@@ -18,25 +18,25 @@ namespace platform::ffmpeg {
 
 namespace {
 
-// The filter: a windowed sinc of 128 crossings (at the lower of the two rates) under a Kaiser window. From 48 to 44.1
-// kHz, measured: 19.5 kHz pass within 0.0001 dB, 22.5 kHz are 119 dB down, and the noise of a sine is at -134 dB.
+// The filter is a sinc with 128 crossings at the lower rate, under a Kaiser window. Measured from 48 to 44.1 kHz: 19.5
+// kHz passes within 0.0001 dB, 22.5 kHz is 119 dB down, and the noise of a sine is at -134 dB.
 constexpr int kCrossings = 128;
 constexpr double kKaiserBeta = 12;
 constexpr double kCutoff = 0.95;
 
-// Ratios with few phases have a filter for each of them (media/decoding/PolyphaseResampler.h). Of the others each frame
-// is the line between two of these many, at its exact time.
+// Ratios with few phases have a filter per phase (media/decoding/PolyphaseResampler.h). For others each frame is
+// interpolated linearly between two of this many filters, at its exact time.
 constexpr std::uint32_t kPhases = 1024;
-constexpr std::uint64_t kMaxCoefficients = 1 << 24; // of 32 bits
+constexpr std::uint64_t kMaxCoefficients = 1 << 24; // of 32 bits each
 
-/// How the library is to build its filter.
+/// Parameters from which the library builds its filter.
 struct Filter {
     std::uint64_t taps;
 
     Filter(std::uint32_t fromRate, std::uint32_t toRate)
     {
         const double factor = std::min(toRate * kCutoff / fromRate, 1.0);
-        taps = static_cast<std::uint64_t>(std::ceil(kCrossings / factor)) + 1; // an even number of them
+        taps = static_cast<std::uint64_t>(std::ceil(kCrossings / factor)) + 1; // an even number
     }
     bool isReasonable() const { return kPhases * taps <= kMaxCoefficients; }
 };
@@ -55,14 +55,14 @@ class RateConverter final : public Resampler {
 public:
     RateConverter(SwrOwner context, const Filter& filter)
         : context_(std::move(context)),
-          reach_(static_cast<std::uint32_t>(filter.taps / 2 + 8)) // taps come in eights
+          reach_(static_cast<std::uint32_t>(filter.taps / 2 + 8)) // taps are rounded up to a multiple of eight
     {
     }
     std::uint32_t reach() const override { return reach_; }
-    std::int32_t reset() override { return statusOf(swr_init(context_.get())); } // the filter stays
+    std::int32_t reset() override { return statusOf(swr_init(context_.get())); } // keeps the filter
     std::int32_t convert(const float* from, std::uint32_t taken, float* to, std::uint32_t& made) override
     {
-        static constexpr float nothing = 0; // a null pointer would say that the sound ends
+        static constexpr float nothing = 0; // a null pointer would end the sound
         const auto* input = reinterpret_cast<const std::uint8_t*>(taken > 0 ? from : &nothing);
         auto* output = reinterpret_cast<std::uint8_t*>(to);
         const int done = swr_convert(context_.get(), &output, static_cast<int>(made), &input, static_cast<int>(taken));

@@ -7,8 +7,8 @@
 
 namespace platform::ffmpeg {
 
-/// As DecoderModule::makeResampler: kFormatNotSupported for rates and channels beyond Resampler's, for two equal rates,
-/// and for rates so far apart, or so odd a ratio, that the filter would be larger than 64 MiB.
+/// As DecoderModule::makeResampler. kFormatNotSupported beyond Resampler's limits, for equal rates, and if the ratio is
+/// so large or so odd that the filter would exceed 64 MiB.
 std::unique_ptr<Resampler> makeRateConverter(std::uint32_t channels, std::uint32_t fromRate, std::uint32_t toRate,
                                              std::int32_t& status);
 

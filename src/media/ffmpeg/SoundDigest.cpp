@@ -63,7 +63,7 @@ void SoundDigest::add(std::uint64_t frame, const std::byte* data, std::size_t fr
         return;
     frame_ += frames;
     const std::size_t samples = frames * channels_;
-    if (kIsLittle && bits_ == width_ * 8) // as they stand
+    if (kIsLittle && bits_ == width_ * 8) // already in file layout
         av_md5_update(state_.get(), reinterpret_cast<const std::uint8_t*>(data), samples * width_);
     else
         addPacked(data, samples);
@@ -77,7 +77,7 @@ void SoundDigest::addPacked(const std::byte* data, std::size_t samples)
     for (std::size_t done = 0; done < samples;) {
         const std::size_t count = std::min(piece, samples - done);
         for (std::size_t i = 0; i < count; ++i) {
-            std::int32_t sample = 0; // at its top
+            std::int32_t sample = 0; // left-aligned
             std::memcpy(reinterpret_cast<char*>(&sample) + (kIsLittle ? sizeof sample - width_ : 0),
                         data + (done + i) * width_, width_);
             sample = inByteOrder(sample >> (32 - width_ * 8 + shift), std::endian::little);
@@ -93,7 +93,7 @@ ConvertingReader::Checksum SoundDigest::result() const
     const std::unique_ptr<AVMD5, Release> copy(av_md5_alloc());
     if (!copy)
         return unknown;
-    std::memcpy(copy.get(), state_.get(), static_cast<std::size_t>(av_md5_size)); // finishing changes it
+    std::memcpy(copy.get(), state_.get(), static_cast<std::size_t>(av_md5_size)); // finishing changes the state
     Value found;
     av_md5_final(copy.get(), reinterpret_cast<std::uint8_t*>(found.data()));
     return found == stated_ ? ConvertingReader::Checksum::same : ConvertingReader::Checksum::differs;

@@ -1,4 +1,4 @@
-// The MD5 that FLAC keeps of its sound, reckoned while that is read.
+// The MD5 that FLAC stores of its sound, computed while the sound is read.
 #pragma once
 
 #include "media/decoding/ConvertingReader.h"
@@ -15,20 +15,20 @@ struct AVMD5;
 
 namespace platform::ffmpeg {
 
-/// Of samples in their order, each little-endian in as many bytes as its bits need (RFC 9639, section 8.2).
+/// Hashes samples in order, each little-endian in as many bytes as its bits need (RFC 9639, section 8.2).
 class SoundDigest {
 public:
     using Value = std::array<std::byte, 16>;
 
-    /// What a stream says of its sound; nothing where it says none.
+    /// The digest that a stream states; none if it states none.
     static std::optional<Value> statedBy(const AVCodecParameters& parameters);
 
-    /// Of samples of `bits` bits that stand at the top of those of `format`, integers in the processor's byte order.
+    /// For samples of `bits` bits, left-aligned in those of `format`; integers are in the processor's byte order.
     SoundDigest(const Value& stated, const StreamDescription& format, std::uint32_t bits);
 
-    /// Frames from `frame` on; counts only in one run from the first.
+    /// Adds frames from number `frame` on; counts only if all frames are added in order from the first.
     void add(std::uint64_t frame, const std::byte* data, std::size_t frames);
-    /// Of `frames` frames in all.
+    /// Compares after `frames` frames in all.
     ConvertingReader::Checksum compare(std::uint64_t frames) const { return frames == frame_ ? result() : unknown; }
 
 private:
@@ -40,9 +40,9 @@ private:
     void addPacked(const std::byte* data, std::size_t samples);
 
     Value stated_;
-    std::uint32_t channels_, width_, bits_; // bytes of a sample here, its bits there
+    std::uint32_t channels_, width_, bits_; // bytes per sample here, bits per sample
     std::unique_ptr<AVMD5, Release> state_;
-    std::uint64_t frame_ = 0; // that comes next
+    std::uint64_t frame_ = 0; // number of the next frame
 };
 
 } // namespace platform::ffmpeg

@@ -66,7 +66,7 @@ std::int32_t SpanDecoder::read(std::uint32_t& frames, void* to)
     return kStatusOK;
 }
 
-/// Decodes until `number` is held, or known to be silent.
+/// Decodes until `number` is available or known to be silent.
 std::int32_t SpanDecoder::bring(std::uint64_t number)
 {
     if (isLost_ || number < silentFrom_ || (number >= held_.end && number - held_.end > reach(number))) {

@@ -1,5 +1,5 @@
-// What the decoders of packets and of files have in common: decoded frames have numbers, and where none come there is
-// silence, so that every number stays what it is.
+// Common base of the packet and file decoders: frames are numbered, and missing ones are silence, so that no number
+// shifts.
 #pragma once
 
 #include "media/decoding/AudioDecoder.h"
@@ -31,30 +31,30 @@ public:
     std::int32_t read(std::uint32_t& frames, void* to) override;
 
 protected:
-    /// The numbers of the frames that lie in decoded(), from its first on.
+    /// The numbers of the frames in decoded(), from its first on.
     struct Span {
         std::uint64_t start = 0, end = 0;
     };
     static constexpr std::uint64_t kNever = ~std::uint64_t{0};
 
-    /// Decodes the next span; {kNever, kNever} when there is none.
+    /// Decodes the next span; {kNever, kNever} at the end.
     virtual std::int32_t next(Span& span) = 0;
-    /// Goes to where decoding gives `number` as in a run from the start, and sets `number` to one, not after it, from
-    /// which on the spans that follow are to be had.
+    /// Moves to where decoding `number` gives the same frames as a run from the start, and sets `number` to the first
+    /// number, not after it, from which the following spans are available.
     virtual std::int32_t startAt(std::uint64_t& number) = 0;
-    /// How many frames it is better to decode than to start anew.
+    /// How many frames ahead decoding on is better than starting anew.
     virtual std::uint64_t reach(std::uint64_t number) = 0;
     virtual const AVFrame& decoded() const = 0;
 
-    /// What the subclass says of the file before anything is read. `first` is the number of the first frame that is
+    /// Called by the subclass before anything is read. `first` is the number of the first frame that belongs to the
     /// sound.
     void describe(FourCC fileType, const StreamDescription& fileFormat, const StreamDescription& frameFormat,
                   std::uint64_t first, std::uint64_t frameCount, std::uint64_t packetCount);
-    /// What the file says of all its sound, samples of `bits` bits.
+    /// Sets the digest that the file states for all of its sound, in samples of `bits` bits.
     void noteChecksum(const SoundDigest::Value& stated, std::uint32_t bits);
-    /// What the subclass knows beside that.
+    /// Sets further facts.
     void note(const SoundFacts& facts) { facts_ = facts; }
-    /// What is decoded is no longer there.
+    /// Marks decoded frames as gone.
     void forget() { isLost_ = true; }
 
 private:
@@ -65,15 +65,15 @@ private:
     SoundFacts facts_;
     std::uint64_t first_ = 0;
     std::uint64_t frameCount_ = 0;
-    std::uint64_t frame_ = 0; // the one to be read next
-    // Numbers from silentFrom_ to the held span are silent.
+    std::uint64_t frame_ = 0; // next frame to read
+    // Frames from silentFrom_ to the held span are silent.
     Span held_;
     std::uint64_t silentFrom_ = 0;
     bool isLost_ = true;
     std::optional<SoundDigest::Value> stated_;
     std::uint32_t statedBits_ = 0;
     std::optional<SoundDigest> digest_;
-    FrameSpans missing_; // that were read as silence
+    FrameSpans missing_; // frames read as silence
 };
 
 } // namespace platform::ffmpeg

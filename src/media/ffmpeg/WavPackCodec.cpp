@@ -20,7 +20,7 @@ namespace platform::ffmpeg {
 
 namespace {
 
-/// A packet as a file that libwavpack reads.
+/// Presents a packet to libwavpack as a file.
 struct Blocks {
     const std::uint8_t* data;
     std::int64_t size, at = 0;
@@ -67,7 +67,7 @@ struct Close {
 };
 using Context = std::unique_ptr<WavpackContext, Close>;
 
-/// Samples stand at the bottom of 32 bits, in as many bytes as they need.
+/// Converts samples that are right-aligned in 32 bits to as many bytes as they need.
 template <class Sample>
 void place(const std::vector<std::int32_t>& samples, int bytes, std::uint8_t* to)
 {
@@ -112,7 +112,7 @@ void WavPackCodec::flush()
 
 Codec::Sent WavPackCodec::send(const AVPacket* packet)
 {
-    constexpr int flagsAt = 24; // in the block's header, little-endian
+    constexpr int flagsAt = 24; // offset in the block's header, little-endian
     constexpr std::uint8_t dsd = 0x80;
     if (packet != nullptr && packet->size >= 32)
         isDSD_ = (packet->data[flagsAt + 3] & dsd) != 0;
@@ -134,8 +134,8 @@ Codec::Result WavPackCodec::receive()
     return isDecoded ? Result::frame : Result::failed;
 }
 
-/// In Matroska the header is one that FFmpeg made, which says that there are no frames in all, and which is not the one
-/// that the block's checksum covers; the samples have one of their own.
+/// FFmpeg makes the headers in Matroska itself; they state no total number of frames, and block checksums do not cover
+/// them. The samples have a checksum of their own.
 bool WavPackCodec::takeHeader()
 {
     constexpr std::size_t total = 12, size = 4;
@@ -144,17 +144,18 @@ bool WavPackCodec::takeHeader()
         return true;
     if (av_packet_make_writable(packet_.get()) < 0)
         throw std::bad_alloc();
-    std::memset(packet_->data + total, 0xFF, size); // not known
+    std::memset(packet_->data + total, 0xFF, size); // unknown
     return false;
 }
 
 bool WavPackCodec::decode()
 {
-    constexpr std::uint32_t mostFrames = 1u << 20, mostChannels = 256; // libwavpack writes blocks of 131,072 at most
+    // libwavpack writes blocks of at most 131,072 frames.
+    constexpr std::uint32_t mostFrames = 1u << 20, mostChannels = 256;
     char error[81] = {};
     const bool hasOwnHeader = takeHeader();
     Blocks blocks{packet_->data, packet_->size};
-    const AVBufferRef* const correction = packet_->opaque_ref; // of CorrectionFile
+    const AVBufferRef* const correction = packet_->opaque_ref; // set by CorrectionFile
     Blocks corrections{correction != nullptr ? correction->data : nullptr,
                        correction != nullptr ? static_cast<std::int64_t>(correction->size) : 0};
     const int flags = OPEN_STREAMING | OPEN_NORMALIZE | (hasOwnHeader ? 0 : OPEN_NO_CHECKSUM) |

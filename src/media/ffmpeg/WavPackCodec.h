@@ -7,9 +7,9 @@
 
 namespace platform::ffmpeg {
 
-/// Each packet is decoded by itself: the blocks of a stretch of time with their headers, as FFmpeg gives them of
-/// WavPack and Matroska files. One that is not what its checksums say has failed. DSD, of which a block needs the one
-/// ahead of it, is left to libavcodec.
+/// Decodes each packet by itself: the blocks of a time span with their headers, as FFmpeg returns them from WavPack and
+/// Matroska files. A packet fails if it contradicts its checksums. DSD, whose blocks depend on those before them, is
+/// left to libavcodec.
 class WavPackCodec final : public Codec {
 public:
     /// As Codec::open.
@@ -30,7 +30,7 @@ private:
 
     std::unique_ptr<Codec> ofDSD_;
     bool isDSD_ = false;
-    Packet packet_; // that is to be decoded; empty when there is none
+    Packet packet_; // the packet to decode; empty if there is none
     Frame frame_;
     bool isEnd_ = false;
     int sourceBits_ = 0;

@@ -12,7 +12,7 @@ namespace platform {
 
 namespace {
 
-/// By their number, as bits of WAVE's channel mask.
+/// Indexed by the number of channels, as bits of WAVE's channel mask.
 constexpr std::array<std::uint32_t, 9> kUsualSpeakers{0, 0x4, 0x3, 0x7, 0x33, 0x37, 0x3F, 0, 0x63F};
 
 const LoudnessModule* loudnessModule()
@@ -22,7 +22,7 @@ const LoudnessModule* loudnessModule()
     return loaded != nullptr && loaded->version == LoudnessModule::currentVersion ? loaded : nullptr;
 }
 
-/// Empty where nothing speaks against it.
+/// Why a format cannot be measured; empty if it can.
 std::string objectionTo(std::uint32_t channels, std::uint32_t sampleRate, std::uint32_t speakers)
 {
     if (channels == 0 || channels > LoudnessMeter::kMostChannels)

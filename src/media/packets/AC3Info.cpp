@@ -15,7 +15,8 @@ constexpr std::size_t kHeaderSize = 8;
 constexpr std::uint64_t kFramesInOne = 1536;
 
 /// The first bytes of a frame. Bits: sync 16, checksum 16, sample rate 2, frame size 6, version 5, service 3, channels
-/// 3, then 2 each for the mixing of a centre, of surrounds and for what two channels are made of, low frequencies 1
+/// 3, then 2 each for the mix of a centre, the mix of surrounds and the kind of stereo, as far as they apply, low
+/// frequencies 1.
 struct Header {
     std::uint32_t size = 0; // bytes of the frame
     std::uint32_t sampleRate = 0;
@@ -28,7 +29,7 @@ struct Header {
     }
 };
 
-/// Size 0 when it is none.
+/// Size 0 if the bytes begin no frame.
 Header parse(BytesView bytes)
 {
     constexpr std::array<std::uint32_t, 19> bitRates{32,  40,  48,  56,  64,  80,  96,  112, 128, 160,
@@ -51,7 +52,7 @@ Header parse(BytesView bytes)
     header.sampleRate = sampleRates[rate];
     header.speakers = speakers[mode] | (hasLowFrequencies ? lowFrequencies : 0);
     header.channels = channels[mode] + (hasLowFrequencies ? 1 : 0);
-    // In words of 16 bits; at 44.1 kHz an odd code has one more.
+    // In 16-bit words; at 44.1 kHz an odd code has one more.
     const std::uint32_t words =
         static_cast<std::uint32_t>(kFramesInOne * 1000 / 16 * bitRates[size / 2] / header.sampleRate);
     header.size = 2 * (words + (rate == 1 ? size & 1 : 0));
@@ -67,7 +68,7 @@ bool isWhole(BytesView frame)
 
 std::int32_t readAC3Info(PacketFile& file, CompressedAudio& audio)
 {
-    constexpr std::uint64_t fewest = 16; // frames; others may be taken for something else
+    constexpr std::uint64_t fewest = 16; // frames; a shorter run may be something else
     constexpr std::size_t proven = 4;
     Header first;
     std::array<std::uint64_t, proven> last{}; // positions

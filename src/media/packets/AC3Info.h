@@ -1,4 +1,4 @@
-// What a stream of AC-3 says of itself (ATSC A/52, 5 and 7.10), every frame of it.
+// What every frame of an AC-3 stream says about it (ATSC A/52, 5 and 7.10).
 #pragma once
 
 #include "media/packets/FileEnds.h"
@@ -6,9 +6,9 @@
 
 namespace platform {
 
-/// As describeByEnds. All headers are read, which must be of one kind and lead from one frame to the next, from the
-/// start of the file to its end; the first frame and the last four must have the right checksums. None of the
-/// extensions of the coding, which have other numbers.
+/// As describeByEnds. Reads all headers, which must be of one kind and lead from frame to frame through the whole file;
+/// the first frame and the last four must have valid checksums. Does not accept the coding's extensions, which have
+/// other version numbers.
 std::int32_t readAC3Info(PacketFile& file, CompressedAudio& audio);
 
 } // namespace platform

@@ -23,7 +23,7 @@ constexpr std::uint32_t kSync = 0xFFF00000;
 constexpr std::uint32_t kADTSKindMask = 0xFFF6FDC0; // sync, layer, profile, rate, channels
 constexpr std::uint32_t kNoCRC = 0x00010000;
 
-/// The length of a frame, header included; 0 when it is none.
+/// Length of the frame, header included; 0 if there is none.
 std::uint32_t frameSize(const std::byte* header)
 {
     const auto bits = loadBE<std::uint32_t>(header);
@@ -44,7 +44,7 @@ std::unique_ptr<PacketSource> ADTSPackets::open(std::unique_ptr<PacketFile>& fil
     const std::uint64_t start = endOfLeadingTags(*file);
     const BytesView bytes = file->at(start, FrameIndex::kLargestFrame + kADTSHeaderSize);
     const std::uint32_t size = bytes.size() >= kADTSHeaderSize ? frameSize(bytes.data()) : 0;
-    // Another frame of the kind follows, or the end.
+    // Another frame of this kind follows, or the end.
     const bool isOne = size > 0 && (bytes.size() == size ||
                                     (bytes.size() >= size + kADTSHeaderSize && frameSize(bytes.data() + size) > 0 &&
                                      (loadBE<std::uint32_t>(bytes.data()) & kADTSKindMask) ==
@@ -75,14 +75,14 @@ ADTSPackets::ADTSPackets(std::unique_ptr<PacketFile> file, std::uint64_t start, 
 
 std::int32_t ADTSPackets::makeFormat()
 {
-    constexpr std::uint32_t kLowComplexity = 1; // one less than in the cookie
+    constexpr std::uint32_t kLowComplexity = 1; // one less than in the configuration
     if ((kind_ >> 14 & 3) != kLowComplexity)
         return AudioHandle::kFormatNotSupported;
     format_.formatId = fourCC("aac ");
     cookie_ = makeAACCookie(kind_ >> 10 & 15, kind_ >> 6 & 7);
     if (const std::int32_t status = readAACCookie(cookie_, format_); status != kStatusOK)
         return status;
-    constexpr double kHighestReplicatedRate = 24000; // of what encoders make
+    constexpr double kHighestReplicatedRate = 24000; // that encoders make
     return format_.sampleRate > kHighestReplicatedRate ? kStatusOK : AudioHandle::kFormatNotSupported;
 }
 
@@ -107,7 +107,7 @@ std::int32_t ADTSPackets::read(std::uint64_t packet, Bytes& bytes)
     FrameIndex::Place place;
     if (const std::int32_t status = index_.find(packet, place); status != kStatusOK)
         return status;
-    const BytesView header = file_->at(place.position, kADTSHeaderSize); // it was found by these bytes
+    const BytesView header = file_->at(place.position, kADTSHeaderSize); // find() recognized them
     const bool hasCRC = (loadBE<std::uint32_t>(header.data()) & kNoCRC) == 0;
     const std::uint32_t headerSize = kADTSHeaderSize + (hasCRC ? kADTSCRCSize : 0);
     return file_->read(place.position + headerSize, place.size - headerSize, bytes);

@@ -7,13 +7,14 @@
 
 namespace platform {
 
-/// AAC-LC above 24 kHz, a raw data block in each frame. At lower rates the decoder may find spectral band replication,
-/// which only the packets' insides tell, and twice the frames; such a file is for a general demultiplexer, and so are
-/// channels that no number names and several blocks in a frame. A packet is what stands behind a frame's header. The
-/// first frame decides on rate and channels; frames of another kind are passed over.
+/// AAC-LC above 24 kHz, one raw data block per frame. At lower rates a decoder may find spectral band replication,
+/// which only the packets' content tells and which doubles the frames; such a file needs a general demultiplexer, and
+/// so do channels without a configuration number and several blocks per frame. A packet is what follows a frame's
+/// header. The first frame decides on rate and channels; frames of another kind are skipped.
 class ADTSPackets final : public PacketSource {
 public:
-    /// Null, with `status` kFormatNotSupported when the file is of another kind. `file` is taken over when it is one.
+    /// Null, with `status` kFormatNotSupported if the file is of another kind. Takes ownership of `file` only if it is
+    /// not.
     static std::unique_ptr<PacketSource> open(std::unique_ptr<PacketFile>& file, std::int32_t& status);
 
     const StreamDescription& format() const override { return format_; }
@@ -31,8 +32,8 @@ private:
     std::int32_t makeFormat();
 
     std::unique_ptr<PacketFile> file_;
-    std::uint32_t kind_;            // what the headers of all frames have in common
-    bool hasSeveralBlocks_ = false; // any frame
+    std::uint32_t kind_;            // the bits that all headers share
+    bool hasSeveralBlocks_ = false; // in any frame
     FrameIndex index_;
     StreamDescription format_;
     Bytes cookie_;

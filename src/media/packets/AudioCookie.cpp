@@ -13,13 +13,13 @@ namespace {
 
 constexpr std::array<std::uint32_t, 13> kSampleRates = {96000, 88200, 64000, 48000, 44100, 32000, 24000,
                                                         22050, 16000, 12000, 11025, 8000,  7350};
-constexpr std::array<std::uint8_t, 8> kChannels = {0, 1, 2, 3, 4, 5, 6, 8}; // by the channel configuration
+constexpr std::array<std::uint8_t, 8> kChannels = {0, 1, 2, 3, 4, 5, 6, 8}; // indexed by channel configuration
 constexpr std::uint32_t kLowComplexity = 2;
 constexpr std::uint32_t kBandReplication = 5;
 constexpr std::uint32_t kSyncExtension = 0x2B7;
-constexpr std::uint32_t kHighestReplicatedRate = 24000; // of what encoders make; the decoder's is twice that
+constexpr std::uint32_t kHighestReplicatedRate = 24000; // that encoders make; decoding doubles it
 
-/// Numbers of any count of bits; zeros behind the end.
+/// Reads numbers of any number of bits; zeros after the end.
 class BitReader {
 public:
     explicit BitReader(BytesView bytes) : bytes_(bytes) {}
@@ -42,7 +42,7 @@ private:
     std::size_t position_ = 0; // bits
 };
 
-/// The body of the descriptor that comes next, when it has the tag.
+/// The body of the next descriptor if it has this tag.
 BytesView takeDescriptor(ByteReader& reader, std::uint8_t tag)
 {
     if (reader.read<std::uint8_t>() != tag)
@@ -54,7 +54,7 @@ BytesView takeDescriptor(ByteReader& reader, std::uint8_t tag)
         if (part < 0x80)
             break;
     }
-    return reader.take(std::min(size, reader.remaining())); // the size that encloses it may be short
+    return reader.take(std::min(size, reader.remaining())); // the enclosing size may be too small
 }
 
 } // namespace
@@ -87,7 +87,7 @@ std::int32_t readESDescriptor(Bytes& cookie, StreamDescription& format)
 {
     enum : std::uint8_t { esTag = 3, decoderTag = 4, specificTag = 5 };
     enum : std::uint8_t { dependsOnStream = 0x80, hasURL = 0x40, hasClock = 0x20 };
-    constexpr std::array<std::uint8_t, 2> kAACObjects = {0x40, 0x67}; // of MPEG-4, and of MPEG-2 in low complexity
+    constexpr std::array<std::uint8_t, 2> kAACObjects = {0x40, 0x67}; // MPEG-4, and MPEG-2 low complexity
     ByteReader reader(cookie);
     ByteReader stream(takeDescriptor(reader, esTag));
     stream.skip(2); // id
@@ -108,7 +108,7 @@ std::int32_t readESDescriptor(Bytes& cookie, StreamDescription& format)
 std::int32_t readALACCookie(Bytes& cookie, StreamDescription& format)
 {
     constexpr std::size_t kSize = 24;
-    constexpr std::uint32_t kMostFrames = 16384; // per packet; more would make packets beyond any decoder
+    constexpr std::uint32_t kMostFrames = 16384; // per packet; more would exceed any decoder
     if (cookie.size() < kSize)
         return kStatusIOError;
     ByteReader reader(cookie);
@@ -130,8 +130,8 @@ std::int32_t readALACCookie(Bytes& cookie, StreamDescription& format)
 
 SoundFacts factsOfCookie(const StreamDescription& format)
 {
-    // By the number of channels. Of eight, AAC would have the inner pair of the front, 0xFF; its encoders mean the
-    // usual ones, and decoders take them for these.
+    // Indexed by the number of channels. For eight, AAC names the inner front pair, 0xFF, but its encoders mean the
+    // usual eight speakers, and decoders agree.
     constexpr std::array<std::uint32_t, 9> aac{0, 0x4, 0x3, 0x7, 0x107, 0x37, 0x3F, 0, 0x63F};
     constexpr std::array<std::uint32_t, 9> alac{0, 0x4, 0x3, 0x7, 0x107, 0x37, 0x3F, 0x13F, 0xFF};
     SoundFacts facts;
@@ -139,7 +139,7 @@ SoundFacts factsOfCookie(const StreamDescription& format)
     if ((isAAC || format.formatId == fourCC("alac")) && format.channelsPerFrame < aac.size())
         facts.speakers = (isAAC ? aac : alac)[format.channelsPerFrame];
     if (isAAC)
-        facts.profile = CodingProfile::aacLC; // else readAACCookie takes none
+        facts.profile = CodingProfile::aacLC; // readAACCookie accepts nothing else
     return facts;
 }
 
@@ -148,9 +148,9 @@ std::uint32_t framesOfALACPacket(BytesView packet, std::uint32_t framesPerPacket
     enum : std::uint32_t { singleChannel = 0, channelPair = 1, lowFrequencies = 3 };
     BitReader bits(packet);
     const std::uint32_t element = bits.read(3);
-    bits.read(4 + 12); // its number, and nothing
+    bits.read(4 + 12); // element instance tag, unused bits
     const bool isPartial = bits.read(1) != 0;
-    bits.read(2 + 1); // shift, compressed or not
+    bits.read(2 + 1); // shift, "not compressed" flag
     const bool isSound = element == singleChannel || element == channelPair || element == lowFrequencies;
     if (!isSound || !isPartial || !bits.has(32))
         return framesPerPacket;
@@ -160,7 +160,7 @@ std::uint32_t framesOfALACPacket(BytesView packet, std::uint32_t framesPerPacket
 Bytes makeAACCookie(std::uint32_t rateIndex, std::uint32_t channelConfiguration)
 {
     const std::uint32_t first = kLowComplexity << 11 | rateIndex << 7 | channelConfiguration << 3;
-    const std::uint32_t extension = kSyncExtension << 13 | kBandReplication << 8; // and a bit 0: there is none
+    const std::uint32_t extension = kSyncExtension << 13 | kBandReplication << 8; // and a 0 bit, which rules it out
     Bytes cookie(5);
     storeBE(cookie.data(), static_cast<std::uint16_t>(first));
     storeBE(cookie.data() + 2, static_cast<std::uint16_t>(extension >> 8));

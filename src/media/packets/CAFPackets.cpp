@@ -21,10 +21,11 @@ std::uint64_t notNegative(std::int64_t number)
     return static_cast<std::uint64_t>(std::max<std::int64_t>(number, 0));
 }
 
-/// Takes off what some writers put around the configuration of ALAC: an atom "frma", and the header of an atom "alac".
+/// Strips the boxes that some writers put around the configuration of ALAC: an atom "frma" and the header of an atom
+/// "alac".
 void unwrapALAC(Bytes& cookie)
 {
-    constexpr std::ptrdiff_t kWrapperSize = 12; // in both: size, type, and four bytes
+    constexpr std::ptrdiff_t kWrapperSize = 12; // both: size, type and four bytes
     for (const FourCC type : {fourCC("frma"), fourCC("alac")})
         if (cookie.size() >= kWrapperSize && loadBE<FourCC>(cookie.data() + 4) == type)
             cookie.erase(cookie.begin(), cookie.begin() + kWrapperSize);
@@ -65,7 +66,7 @@ std::int32_t CAFPackets::readChunks()
     return status == kStatusOK ? checkCoding() : status;
 }
 
-/// Of AAC and ALAC; what the cookie says must agree with the description.
+/// For AAC and ALAC. The cookie must agree with the description.
 std::int32_t CAFPackets::readCookie(const ContainerLayout& layout)
 {
     const bool isAAC = format_.formatId == fourCC("aac ");
@@ -116,7 +117,7 @@ std::int32_t CAFPackets::readPackets(const ContainerLayout& layout, const AudioD
     const std::uint64_t frames = index_.count() * format_.framesPerPacket;
     valid = reader.ok() ? std::min(valid, frames) : frames;
     if (format_.formatId == fourCC("alac") && index_.count() > 0) {
-        // Kept: some writers count the last packet as a full one.
+        // Kept: some writers count the last packet as full.
         const PacketIndex::Place last = index_.place(index_.count() - 1);
         const BytesView start =
             file_->at(last.position, static_cast<std::size_t>(std::min<std::uint64_t>(last.size, 8)));
@@ -126,7 +127,7 @@ std::int32_t CAFPackets::readPackets(const ContainerLayout& layout, const AudioD
     return makePacketTable(frames, priming, valid, table_);
 }
 
-/// Numbers of 7 bits a byte, the highest first; all but the last byte of a number have the high bit.
+/// Numbers of 7 bits per byte, highest first; all bytes of a number but the last have the high bit set.
 std::int32_t CAFPackets::readSizes(std::uint64_t position, std::uint64_t end, std::uint64_t count)
 {
     if (count > end - position)

@@ -1,4 +1,4 @@
-// The packets of a CAF file (published format description, version 1.0) that holds no linear PCM.
+// The packets of a CAF file (published format description, version 1.0) whose sound is not linear PCM.
 #pragma once
 
 #include "media/containers/AudioDescription.h"
@@ -12,13 +12,13 @@
 
 namespace platform {
 
-/// AAC-LC, ALAC, MP3 and IMA 4:1, in packets that all have as many frames; other codings are for a general
-/// demultiplexer, but for those that nothing here decodes, which are here by their ids. Packets of one size need no
-/// packet table; one that is there then says which frames are sound. Packets that a file has lost at its end are not
-/// counted.
+/// AAC-LC, ALAC, MP3 and IMA 4:1 in packets of one length. Other codings need a general demultiplexer, except those
+/// that nothing here decodes, which are reported by their ids. Packets of one size need no packet table; if there is
+/// one, it tells which frames belong to the sound. Packets missing at the file's end do not count.
 class CAFPackets final : public PacketSource {
 public:
-    /// Null, with `status` kFormatNotSupported when the file is of another kind. `file` is taken over when it is one.
+    /// Null, with `status` kFormatNotSupported if the file is of another kind. Takes ownership of `file` only if it is
+    /// not.
     static std::unique_ptr<PacketSource> open(std::unique_ptr<PacketFile>& file, std::int32_t& status);
 
     const StreamDescription& format() const override { return format_; }
@@ -40,7 +40,7 @@ private:
 
     std::unique_ptr<PacketFile> file_;
     StreamDescription format_;
-    std::optional<MPEGFrameHeader> mpeg_; // of MP3: that of the first packet
+    std::optional<MPEGFrameHeader> mpeg_; // for MP3: header of the first packet
     Bytes cookie_;
     PacketIndex index_;
     PacketTable table_;

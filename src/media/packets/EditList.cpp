@@ -12,13 +12,13 @@ namespace platform {
 
 namespace {
 
-/// The first bytes of a box's body, at most `most`; good until the next use of the file.
+/// The first bytes of a box's body, at most `most`; valid until the file is used again.
 BytesView bodyOf(PacketFile& file, const std::optional<MP4Box>& box, std::size_t most)
 {
     return box ? file.at(box->body, static_cast<std::size_t>(std::min<std::uint64_t>(box->size(), most))) : BytesView{};
 }
 
-/// The hexadecimal numbers of a text, with spaces between them.
+/// The hexadecimal numbers of a text, separated by spaces.
 template <std::size_t count>
 bool readNumbers(std::string_view text, std::array<std::uint64_t, count>& numbers)
 {

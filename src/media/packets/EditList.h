@@ -1,5 +1,5 @@
-// Which part of an MP4 file's frames is the sound: what its edit list says (ISO/IEC 14496-12, 8.6.6), and the gapless
-// item among its tags: a freeform item ("----") whose name ends in "SMPB".
+// Which part of an MP4 file's frames is the sound, according to its edit list (ISO/IEC 14496-12, 8.6.6) and to the
+// gapless item among its tags, a freeform item ("----") whose name ends in "SMPB".
 #pragma once
 
 #include "media/packets/MP4Boxes.h"
@@ -10,21 +10,22 @@
 namespace platform {
 
 struct MP4Edit {
-    std::uint64_t start = 0;    // in units of the track
-    std::uint64_t duration = 0; // in units of the movie; 0: to the end
+    std::uint64_t start = 0;    // in the track's units
+    std::uint64_t duration = 0; // in the movie's units; 0: to the end
 };
 
-/// The one edit of a track, or none in `edit`; kFormatNotSupported for lists that do more than cut start and end.
+/// Reads the one edit of a track; none in `edit` if there is no list. kFormatNotSupported for lists that do more than
+/// cut start and end.
 std::int32_t readEditList(PacketFile& file, const MP4Box& track, std::optional<MP4Edit>& edit);
 
-/// All in frames.
+/// In frames.
 struct GaplessItem {
     std::uint32_t priming = 0;
     std::uint32_t remainder = 0;
     std::uint64_t validFrames = 0;
 };
 
-/// None when the movie has no gapless item that is understood. Its value is text: hexadecimal numbers behind spaces, of
+/// None if the movie has no gapless item that can be read. Its value is a text of hexadecimal numbers after spaces, of
 /// which the second, third and fourth are these.
 std::optional<GaplessItem> readGaplessItem(PacketFile& file, const MP4Box& movie);
 

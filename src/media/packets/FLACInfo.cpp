@@ -16,7 +16,7 @@ namespace platform {
 
 namespace {
 
-/// The mask in a comment that names the speakers of channels which are not the usual ones; 0 without it.
+/// The channel mask in a comment, which names speakers that are not the usual ones; 0 if there is none.
 std::uint32_t speakersOfComments(BytesView comments)
 {
     constexpr std::string_view key = "WAVEFORMATEXTENSIBLE_CHANNEL_MASK=0x";
@@ -37,7 +37,7 @@ std::uint32_t speakersOfComments(BytesView comments)
     return 0;
 }
 
-/// Which speakers the file's channels feed: the usual ones of so many, if no comment says otherwise.
+/// The speakers of the file's channels: the usual ones unless a comment says otherwise.
 std::uint32_t speakersOfFLAC(HeaderWindow& file, std::uint32_t channels)
 {
     constexpr int mostBlocks = 64;
@@ -62,7 +62,7 @@ std::uint32_t speakersOfFLAC(HeaderWindow& file, std::uint32_t channels)
     return usualSpeakersOfFLAC(channels);
 }
 
-/// As many as a frame has at most, where the file says so.
+/// As many bytes as the largest frame has, if the file states that.
 Bytes lastBytes(HeaderWindow& file, std::uint32_t largestFrame)
 {
     constexpr std::uint32_t usual = 1 << 15, most = 1 << 18;
@@ -84,9 +84,9 @@ std::optional<FLACFrame> parseFLACFrame(BytesView bytes, std::uint32_t blockSize
     if (bytes.size() < kFixedSize + 2)
         return {};
     const auto fixed = loadBE<std::uint32_t>(bytes.data());
-    if (fixed >> 17 != 0x7FFC || (fixed & 1) != 0) // sync, a reserved bit of 0; and another one
+    if (fixed >> 17 != 0x7FFC || (fixed & 1) != 0) // sync and a reserved 0; a second reserved 0
         return {};
-    // Of the frame, or where sizes differ of its first sample, coded like a character in UTF-8.
+    // Number of the frame, or of its first sample if sizes differ, coded like a character in UTF-8.
     const auto first = std::to_integer<std::uint8_t>(bytes[kFixedSize]);
     const int ones = std::countl_one(first);
     const std::size_t length = ones == 0 ? 1 : static_cast<std::size_t>(ones);
@@ -119,7 +119,7 @@ std::optional<FLACFrame> parseFLACFrame(BytesView bytes, std::uint32_t blockSize
     frame.first = countsSamples ? number : number * blockSize;
     frame.samples = size;
     frame.sampleRate = rate < rates.size() ? rates[rate] : written * (rate == 12 ? 1000 : rate == 14 ? 10 : 1);
-    frame.channels = (fixed >> 4 & 8) != 0 ? 2 : (fixed >> 4 & 7) + 1; // two in one of three ways, or as many
+    frame.channels = (fixed >> 4 & 8) != 0 ? 2 : (fixed >> 4 & 7) + 1; // a stereo mode, or independent channels
     frame.bits = bits[fixed >> 1 & 7];
     return frame;
 }
@@ -133,7 +133,7 @@ bool flacEndsAt(BytesView tail, std::uint64_t samples, std::uint32_t blockSize)
             continue;
         const auto frame = parseFLACFrame(rest, blockSize);
         if (frame && frame->first + frame->samples == samples &&
-            highFirstCRC<16, 0x8005>(rest) == 0) // with its own checksum behind it
+            highFirstCRC<16, 0x8005>(rest) == 0) // the checksum follows the bytes that it covers
             return true;
     }
     return false;
@@ -163,7 +163,7 @@ FLACProperties readFLACProperties(BytesView bytes)
 
 std::int32_t readFLACInfo(HeaderWindow& file, FLACInfo& info)
 {
-    constexpr std::uint64_t offset = 8;         // behind the marker and a block's header
+    constexpr std::uint64_t offset = 8;         // after the marker and a block's header
     constexpr std::uint64_t smallestBlock = 10; // bytes
     info = {};
     info.format.formatId = fourCC("flac");

@@ -32,11 +32,10 @@ std::int32_t describe(const EndKind& kind, const std::string& path, CompressedAu
         return PosixErrorToOSErr();
     PacketFile file(descriptor, static_cast<std::uint64_t>(std::max<std::int64_t>(found.size, 0)));
     const std::int32_t status = kind.read(file, audio);
-    return status == kStatusOK ? file.takeStatus() : status; // a tag may stand where nothing could be read
+    return status == kStatusOK ? file.takeStatus() : status; // a tag may be where nothing could be read
 }
 
-/// Whether the file beside it that corrects a lossy one, if there is one, is as whole: of one that is broken no sound
-/// may come.
+/// Whether the correction file beside a lossy one is equally whole, if there is one: a broken one may spoil the sound.
 bool isCorrected(const EndKind& kind, const std::string& path, std::uint64_t frames)
 {
     CompressedAudio corrections;

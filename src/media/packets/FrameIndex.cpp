@@ -12,7 +12,7 @@ namespace platform {
 namespace {
 
 constexpr std::uint64_t kMostJunk = std::uint64_t{1} << 20;
-constexpr std::size_t kReach = FrameIndex::kLargestFrame + FrameIndex::kHeaderSize; // a frame and the header behind it
+constexpr std::size_t kReach = FrameIndex::kLargestFrame + FrameIndex::kHeaderSize; // a frame and the next header
 static_assert(2 * kReach <= PacketFile::kMostAtOnce);
 
 } // namespace
@@ -80,7 +80,7 @@ bool FrameIndex::skipTag()
     return true;
 }
 
-/// Moves on to a frame that another one, or the end of the stream, follows: a single header may be chance.
+/// Moves to the next frame that is followed by another one or by the end of the stream; a single header may be chance.
 bool FrameIndex::skipJunk()
 {
     const std::uint64_t limit = std::min(end_, next_ + kMostJunk);
@@ -89,7 +89,7 @@ bool FrameIndex::skipJunk()
         const BytesView bytes = file_.at(from, wanted);
         if (bytes.size() < wanted)
             return false;
-        const std::size_t starts = wanted == end_ - from ? wanted : wanted - kReach; // candidates seen whole
+        const std::size_t starts = wanted == end_ - from ? wanted : wanted - kReach; // whole candidates
         for (std::size_t i = 0; i < starts; ++i) {
             const void* found = std::memchr(bytes.data() + i, 0xFF, starts - i);
             if (found == nullptr)

@@ -1,5 +1,5 @@
-// Where the frames of a stream stand that has no table of them: each frame begins with a header that tells its length,
-// so that one leads to the next (MP3, ADTS). Found as far as somebody asks, and kept.
+// Positions of the frames in a stream without a table, where each frame's header tells its length and so leads to the
+// next (MP3, ADTS). Frames are found as far as they are asked for, and kept.
 #pragma once
 
 #include "media/packets/PacketFile.h"
@@ -11,16 +11,16 @@
 
 namespace platform {
 
-/// Bytes that are no frame are passed over, an ID3v2 tag by its size, up to 1 MiB in a run: where there are more, the
-/// sound ends. A frame that the file cuts off is none. 8 bytes of memory for each frame found: 1.1 MB for an hour of
-/// MP3 at 44.1 kHz.
+/// Skips bytes that are no frame, and an ID3v2 tag by its size; after 1 MiB of them in a run the sound ends. A frame
+/// that the file cuts off does not count. Each frame found takes 8 bytes of memory: 1.1 MB for an hour of MP3 at 44.1
+/// kHz.
 class FrameIndex {
 public:
-    static constexpr std::size_t kHeaderSize = 7; // bytes that a header is judged by; no frame has fewer
+    static constexpr std::size_t kHeaderSize = 7; // bytes that identify a header; no frame is shorter
     static constexpr std::size_t kLargestFrame = 8192;
 
-    /// The length of a frame, its header included, by the first kHeaderSize bytes of it; 0 when there is no frame of
-    /// this stream. The first byte of a frame is 0xFF.
+    /// Length of a frame with its header, from its first kHeaderSize bytes; 0 if they begin no frame of this stream.
+    /// The first byte of a frame is 0xFF.
     using Measure = std::function<std::uint32_t(const std::byte* header)>;
 
     struct Place {
@@ -28,20 +28,20 @@ public:
         std::uint32_t size = 0;
     };
 
-    /// The frames between two places of the file, which outlives this.
+    /// The frames between two positions of the file, which outlives this.
     FrameIndex(PacketFile& file, std::uint64_t start, std::uint64_t end, Measure measure);
 
-    /// kStatusEndOfFile when there are not as many.
+    /// kStatusEndOfFile if there are not that many.
     std::int32_t find(std::uint64_t frame, Place& place);
-    /// Finds all of them.
+    /// Finds all frames.
     std::int32_t count(std::uint64_t& frames);
-    /// Where a frame that find() found begins.
+    /// Position of a frame that find() has found.
     std::uint64_t position(std::uint64_t frame) const { return positions_[frame]; }
 
 private:
-    /// Finds one more frame; kStatusEndOfFile when there is none.
+    /// Finds one more frame; kStatusEndOfFile if there is none.
     std::int32_t step();
-    /// The size of the frame at `bytes`, which reach to the end of the stream or far enough; 0 if there is none.
+    /// Size of the frame at `bytes`, which reach far enough or to the end of the stream; 0 if there is none.
     std::uint32_t frameAt(BytesView bytes) const;
     bool skipTag();
     bool skipJunk();
@@ -49,7 +49,7 @@ private:
     PacketFile& file_;
     std::uint64_t end_;
     Measure measure_;
-    std::uint64_t next_; // where the frame after the last one found is looked for
+    std::uint64_t next_; // where the search for the next frame begins
     bool isComplete_ = false;
     std::vector<std::uint64_t> positions_;
 };

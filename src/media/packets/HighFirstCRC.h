@@ -1,5 +1,5 @@
-// Cyclic redundancy checks that take each byte from its highest bit on, as frames of FLAC and pages of Ogg have them.
-// ECCRC32 (platform/core) is the other kind.
+// Cyclic redundancy checks that process each byte from its highest bit, as in FLAC frames and Ogg pages. ECCRC32
+// (platform/core) begins with the lowest.
 #pragma once
 
 #include "platform/core/Bytes.h"
@@ -10,13 +10,14 @@
 
 namespace platform {
 
-/// The remainder of a division by a polynomial of `width` bits, 8 to 32, of zeros ahead of the first byte. `previous`
-/// is that of the bytes ahead.
+/// Remainder of the division by a polynomial of `width` bits, 8 to 32, with initial value zero. `previous` is the
+/// remainder of the bytes before.
 template <unsigned width, std::uint32_t polynomial>
 std::uint32_t highFirstCRC(BytesView bytes, std::uint32_t previous = 0)
 {
     constexpr unsigned unused = 32 - width; // low bits of the register
-    // What a byte adds that is followed by as many bytes as the table has ahead of it: four go at a time.
+    // Contribution of a byte that is followed by as many bytes as the table's index, so that four bytes are processed
+    // at a time.
     static constexpr auto tables = [] {
         std::array<std::array<std::uint32_t, 256>, 4> made{};
         for (std::uint32_t value = 0; value < 256; ++value) {

@@ -15,8 +15,8 @@ constexpr std::uint32_t kLayerIIFrames = 1152;
 // Bits: sync 12, MPEG-1 1, layer 2, no CRC 1, bit rate 4, sample rate 2, padding 1, private 1, mode 2, …, emphasis 2
 constexpr std::uint32_t kLayerMask = 0xFFF60000, kLayerII = 0xFFF40000;
 constexpr std::uint32_t kLayerIIKindMask = 0xFFFE0C00; // sync, version, layer, sample rate
-// And mode, copyright, original, emphasis: a demultiplexer that looks for a stream skips a first frame that has not
-// these in common with the second.
+// Further bits: mode, copyright, original, emphasis. A demultiplexer that searches for a stream skips a first frame
+// that differs in these from the second.
 constexpr std::uint32_t kStartMask = 0xFFFE0CCF;
 
 bool isMono(std::uint32_t header)
@@ -24,7 +24,7 @@ bool isMono(std::uint32_t header)
     return (header >> 6 & 3) == 3;
 }
 
-/// 0 when the value is reserved.
+/// 0 if the value is reserved.
 std::uint32_t sampleRateOf(std::uint32_t header)
 {
     constexpr std::array<std::uint32_t, 4> rates{44100, 48000, 32000, 0};
@@ -32,10 +32,10 @@ std::uint32_t sampleRateOf(std::uint32_t header)
     return rates[header >> 10 & 3] / (isMPEG1 ? 1 : 2);
 }
 
-/// In bytes; 0 when it is no frame of the layer.
+/// In bytes; 0 if it is no frame of this layer.
 std::uint32_t frameSize(std::uint32_t header)
 {
-    // By the index in the header, in kilobits per second: of MPEG-2 at half the rates, then of MPEG-1.
+    // Kilobits per second by the header's index: for the half rates of MPEG-2, then for MPEG-1.
     constexpr std::array<std::array<std::uint16_t, 16>, 2> bitRates{
         {{0, 8, 16, 24, 32, 40, 48, 56, 64, 80, 96, 112, 128, 144, 160, 0},
          {0, 32, 48, 56, 64, 80, 96, 112, 128, 160, 192, 224, 256, 320, 384, 0}}};
@@ -49,7 +49,7 @@ std::uint32_t frameSize(std::uint32_t header)
 
 std::int32_t readLayerIIInfo(PacketFile& file, CompressedAudio& audio)
 {
-    constexpr std::uint64_t fewest = 16; // frames; others may be taken for something else
+    constexpr std::uint64_t fewest = 16; // frames; a shorter run may be something else
     std::uint32_t first = 0;
     std::uint64_t count = 0, at = 0;
     for (; at < file.length(); ++count) {

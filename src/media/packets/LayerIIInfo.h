@@ -1,4 +1,4 @@
-// What a stream of MPEG audio layer II says of itself (ISO/IEC 11172-3 and 13818-3), every frame of it.
+// What every frame of an MPEG audio layer II stream says about it (ISO/IEC 11172-3 and 13818-3).
 #pragma once
 
 #include "media/packets/FileEnds.h"
@@ -6,8 +6,8 @@
 
 namespace platform {
 
-/// As describeByEnds. All headers are read, which must be of one kind and lead from one frame to the next, from the
-/// start of the file to its end. Bit rates may differ, but for "free format".
+/// As describeByEnds. Reads all headers, which must be of one kind and lead from frame to frame through the whole file.
+/// Bit rates may vary, except for "free format".
 std::int32_t readLayerIIInfo(PacketFile& file, CompressedAudio& audio);
 
 } // namespace platform

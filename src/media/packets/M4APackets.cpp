@@ -30,7 +30,7 @@ FourCC fileTypeOf(FourCC brand)
     return isAudio ? fourCC("m4af") : fourCC("mp4f");
 }
 
-/// The field of a box "mdhd" or "mvhd" that says how many of its units make a second; 0 when there is none.
+/// Units per second from a box "mdhd" or "mvhd"; 0 if there is none.
 std::uint32_t timescaleOf(PacketFile& file, const std::optional<MP4Box>& header)
 {
     if (!header || header->size() < 24)
@@ -38,7 +38,7 @@ std::uint32_t timescaleOf(PacketFile& file, const std::optional<MP4Box>& header)
     const BytesView fields = file.at(header->body, 24);
     if (fields.size() < 24)
         return 0;
-    return loadBE<std::uint32_t>(fields.data() + (fields[0] == std::byte{1} ? 20 : 12)); // dates of 64 bits, or 32
+    return loadBE<std::uint32_t>(fields.data() + (fields[0] == std::byte{1} ? 20 : 12)); // after dates of 64 or 32 bits
 }
 
 } // namespace
@@ -112,10 +112,10 @@ std::int32_t M4APackets::findTrack(const MP4Box& movie, Track& track)
     return facts_.tracks > 0 ? kStatusOK : AudioHandle::kFormatNotSupported;
 }
 
-/// Fills format and cookie from the first entry of "stsd".
+/// Sets format and cookie from the first entry of "stsd".
 std::int32_t M4APackets::readSampleEntry(const MP4Box& descriptions)
 {
-    constexpr std::uint64_t kFieldsSize = 28; // and in MOV 16 more in version 1, 36 in version 2
+    constexpr std::uint64_t kFieldsSize = 28; // MOV adds 16 in version 1, 36 in version 2
     MP4Box entry;
     if (!MP4Boxes(*file_, descriptions, 8).next(entry))
         return kStatusIOError;

@@ -8,13 +8,13 @@
 
 namespace platform {
 
-/// The first audio track, whatever stands beside it: AAC-LC and ALAC. Other codings, fragmented files, and edits other
-/// than one that cuts the start and the end are for a general demultiplexer; but sounds that are locked, and those of
-/// the ids "sac1" and "sal1", are here by their ids, so that no demultiplexer is asked for them. Packets that a file
-/// has lost at its end are not counted.
+/// The first audio track, whatever else there is: AAC-LC and ALAC. Other codings, fragmented files, and edits that do
+/// more than cut start and end need a general demultiplexer, except protected sound and the ids "sac1" and "sal1",
+/// which are reported by their ids so that no demultiplexer is asked. Packets missing at the file's end do not count.
 class M4APackets final : public PacketSource {
 public:
-    /// Null, with `status` kFormatNotSupported when the file is of another kind. `file` is taken over when it is one.
+    /// Null, with `status` kFormatNotSupported if the file is of another kind. Takes ownership of `file` only if it is
+    /// not.
     static std::unique_ptr<PacketSource> open(std::unique_ptr<PacketFile>& file, std::int32_t& status);
 
     const StreamDescription& format() const override { return format_; }

@@ -9,13 +9,13 @@ namespace platform {
 
 namespace {
 
-constexpr std::size_t kOffsetOfVBRI = MPEGFrameHeader::size + 32; // whatever the version and the channels
+constexpr std::size_t kOffsetOfVBRI = MPEGFrameHeader::size + 32; // for any version and channels
 constexpr std::size_t kSeekTableSize = 100;
 
-/// The header with its id, up to the frame's end; empty when there is none.
+/// From the header's id to the frame's end; empty if there is no such header.
 BytesView infoHeader(const MPEGFrameHeader& header, BytesView frame)
 {
-    // Kept: of frames with a CRC some writers leave its bytes out, others do not.
+    // Kept: in frames with a CRC, some writers skip its bytes and others do not.
     for (const std::size_t crcSize : {0U, 2U}) {
         const std::size_t offset = MPEGFrameHeader::size + crcSize + header.sideInfoSize();
         if (offset + 4 > frame.size() || (crcSize > 0 && !header.hasCRC))

@@ -16,11 +16,11 @@ namespace {
 
 constexpr std::uint64_t kMostJunkAhead = std::uint64_t{1} << 16;
 constexpr std::uint64_t kMostZerosAhead = std::uint64_t{1} << 20;
-constexpr int kRunBehindJunk = 8; // frames that must follow each other to be believed
+constexpr int kRunBehindJunk = 8; // frames in a row that make a stream credible
 constexpr int kRunAtStart = 2;
-constexpr std::uint32_t kDecoderDelay = 529; // frames, of every decoder of layer III
+constexpr std::uint32_t kDecoderDelay = 529; // frames, in every layer III decoder
 
-/// Containers that may hold MP3 packets, a few in a row, which are not to be taken for a bare stream.
+/// Containers that may hold a few MP3 packets in a row, and must not be taken for a bare stream.
 bool isContainer(BytesView start)
 {
     constexpr std::array ids = {fourCC("RIFF"),     fourCC("RIFX"),     fourCC("FORM"),    fourCC("caff"),
@@ -30,8 +30,8 @@ bool isContainer(BytesView start)
                                  loadBE<FourCC>(start.data() + 4) == fourCC("ftyp"));
 }
 
-/// The header at the start of `bytes` when `run` frames of a stream follow each other there, the last of them seen
-/// by its header at least; or fewer up to the end of the file.
+/// The header at the start of `bytes` if `run` frames of a stream follow each other there, of the last of which at
+/// least the header is in view; fewer suffice at the end of the file.
 std::optional<MPEGFrameHeader> headerOfRun(BytesView bytes, int run, bool reachesEnd)
 {
     if (bytes.size() < FrameIndex::kHeaderSize)
@@ -69,7 +69,7 @@ struct Run {
     MPEGFrameHeader header;
 };
 
-/// The first run of frames between two places that is long enough to be believed.
+/// The first credible run of frames between two positions.
 std::optional<Run> findRun(PacketFile& file, std::uint64_t position, std::uint64_t limit)
 {
     constexpr std::size_t kPiece = PacketFile::kMostAtOnce / 2;
@@ -94,14 +94,14 @@ std::optional<Run> findRun(PacketFile& file, std::uint64_t position, std::uint64
 
 struct MP3Packets::Start {
     std::uint64_t position = 0;
-    std::optional<MPEGFrameHeader> header; // none: the file is no MP3
+    std::optional<MPEGFrameHeader> header; // none if the file is no MP3
     std::optional<MP3Info> info;
-    std::optional<MPEGFrameHeader> sound; // of the frames of sound
+    std::optional<MPEGFrameHeader> sound; // of the frames that are sound
 
     std::uint64_t soundPosition() const { return position + (info ? header->frameSize : 0); }
 };
 
-/// The frame at `position`, when it says what the others are, or `run` frames of a stream begin there.
+/// The frame at `position`, if it describes the others or begins `run` frames of a stream.
 MP3Packets::Start MP3Packets::startAt(PacketFile& file, std::uint64_t position, int run)
 {
     Start start;
@@ -119,8 +119,8 @@ MP3Packets::Start MP3Packets::startAt(PacketFile& file, std::uint64_t position, 
     return start;
 }
 
-/// A header at the start may be chance, and the one of a damaged frame says what is not so: it is believed when frames
-/// that belong with it follow, else the frames that do follow each other decide.
+/// A header at the start may be chance, and that of a damaged frame wrong, so it is trusted only if frames that belong
+/// to it follow; otherwise the first frames that follow each other decide.
 MP3Packets::Start MP3Packets::findStart(PacketFile& file)
 {
     const std::uint64_t tagEnd = endOfLeadingTags(file);
@@ -128,7 +128,7 @@ MP3Packets::Start MP3Packets::findStart(PacketFile& file)
         return {};
     Start start = startAt(file, endOfZeros(file, tagEnd), kRunAtStart);
     if (start.header) {
-        // Writers of the frame ahead of the sound may take other channels for it.
+        // The writer of the frame before the sound may give it other channels.
         const BytesView bytes = file.at(start.soundPosition(), PacketFile::kMostAtOnce);
         const bool reachesEnd = start.soundPosition() + bytes.size() == file.length();
         const auto sound = headerOfRun(bytes, start.info ? kRunAtStart : kRunBehindJunk, reachesEnd);
@@ -179,7 +179,7 @@ MP3Packets::MP3Packets(std::unique_ptr<PacketFile> file, const Start& start, std
     facts_.speakers = first_.speakers();
 }
 
-/// The header's count is taken when its bytes are those that are there and could be so many frames.
+/// Trusts the header's count if its byte count matches and allows for so many frames.
 std::int32_t MP3Packets::countPackets(const Start& start, std::uint64_t end)
 {
     const MP3Info info = start.info.value_or(MP3Info{});
@@ -194,19 +194,19 @@ std::int32_t MP3Packets::countPackets(const Start& start, std::uint64_t end)
     return index_.count(packetCount_);
 }
 
-/// `byteCount` are the bytes from the first frame on.
+/// `byteCount` counts from the first frame.
 void MP3Packets::makeTable(const MP3Info& info, std::uint64_t byteCount)
 {
     const auto frames = static_cast<std::int64_t>(packetCount_ * format_.framesPerPacket);
     if (info.padding) {
-        // What the decoder delays comes out of the padding. Of a file that was cut the padding is gone.
+        // The decoder's delay comes out of the padding, which is gone if the file was cut.
         const bool isWhole = !info.frameCount || *info.frameCount == packetCount_;
         const auto padding = static_cast<std::int32_t>(info.padding->padding);
         table_.primingFrames = static_cast<std::int32_t>(info.padding->delay + kDecoderDelay);
         table_.remainderFrames = isWhole ? std::max<std::int32_t>(0, padding - std::int32_t{kDecoderDelay}) : 0;
     }
     table_.validFrames = std::max<std::int64_t>(0, frames - table_.primingFrames - table_.remainderFrames);
-    // Some writers count the frame that says so, too: bytes that are all there tell.
+    // Some writers count the describing frame too, which shows if all bytes are present.
     if (info.frameCount && *info.frameCount > packetCount_ && byteCount < info.byteCount.value_or(UINT32_MAX)) {
         const std::uint64_t promised = std::uint64_t{*info.frameCount} * format_.framesPerPacket;
         const std::uint64_t padding = info.padding ? std::uint64_t{info.padding->delay} + info.padding->padding : 0;
@@ -220,8 +220,8 @@ std::uint64_t MP3Packets::preRoll(std::uint64_t packet)
     packet = std::min(packet, packetCount_);
     FrameIndex::Place place;
     if (packet == 0 || index_.find(packet - 1, place) != kStatusOK)
-        return std::min(packet, kUsually); // read() will tell
-    // Brings what is asked for backwards into the window, from its first byte on.
+        return std::min(packet, kUsually); // read() reports the failure
+    // Loads what is asked for backwards into the window, from its first byte.
     const std::uint64_t from = index_.position(packet - std::min(packet, kUsually));
     const auto size =
         static_cast<std::size_t>(std::min<std::uint64_t>(PacketFile::kMostAtOnce, place.position + place.size - from));
@@ -231,7 +231,7 @@ std::uint64_t MP3Packets::preRoll(std::uint64_t packet)
         const auto header = bytes.size() < MPEGFrameHeader::size ? std::nullopt : MPEGFrameHeader::parse(bytes.data());
         return header ? header->mainDataSize() : 0;
     });
-    file_->takeStatus(); // what cannot be read, read() tells
+    file_->takeStatus(); // read() reports what cannot be read
     return ahead;
 }
 

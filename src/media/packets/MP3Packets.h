@@ -8,11 +8,11 @@
 
 namespace platform {
 
-/// The first frame of sound that others follow decides on version, sample rate and channels; frames of another kind are
-/// passed over like any other bytes that are none. A packet is a whole frame, its header included.
+/// The first sound frame that others follow decides on version, sample rate and channels; frames of another kind are
+/// skipped like other foreign bytes. A packet is a whole frame with its header.
 class MP3Packets final : public PacketSource {
 public:
-    /// Null, with `status` kFormatNotSupported when the file is no MP3. `file` is taken over when it is.
+    /// Null, with `status` kFormatNotSupported if the file is no MP3. Takes ownership of `file` only if it is.
     static std::unique_ptr<PacketSource> open(std::unique_ptr<PacketFile>& file, std::int32_t& status);
 
     const StreamDescription& format() const override { return format_; }
@@ -25,7 +25,7 @@ public:
     std::int32_t read(std::uint64_t packet, Bytes& bytes) override;
 
 private:
-    struct Start; // of the frames, and what the first says
+    struct Start; // where the frames begin, and what the first one says
     static Start findStart(PacketFile& file);
     static Start startAt(PacketFile& file, std::uint64_t position, int run);
     MP3Packets(std::unique_ptr<PacketFile> file, const Start& start, std::uint64_t end);

@@ -1,4 +1,4 @@
-// The boxes that MP4 and MOV files are made of (ISO/IEC 14496-12, 4.2).
+// The boxes of MP4 and MOV files (ISO/IEC 14496-12, 4.2).
 #pragma once
 
 #include "media/packets/PacketFile.h"
@@ -9,7 +9,7 @@
 
 namespace platform {
 
-/// Places in the file: the body begins behind the header.
+/// Positions in the file; the body follows the header.
 struct MP4Box {
     FourCC type = 0;
     std::uint64_t body = 0;
@@ -18,18 +18,18 @@ struct MP4Box {
     std::uint64_t size() const { return end - body; }
 };
 
-/// The boxes between two places, one after the other.
+/// Iterates over the boxes between two positions.
 class MP4Boxes {
 public:
     MP4Boxes(PacketFile& file, std::uint64_t position, std::uint64_t end) : file_(file), position_(position), end_(end)
     {
     }
-    /// Those in a box, behind the first `fields` bytes of its body.
+    /// The boxes in a box, after the first `fields` bytes of its body.
     MP4Boxes(PacketFile& file, const MP4Box& parent, std::uint64_t fields = 0);
 
-    /// False at the end, and where no box is. One that claims to be longer than the room for it ends with that.
+    /// False at the end, and at bytes that are no box. A box that claims too much ends with the room for it.
     bool next(MP4Box& box);
-    /// The next one of a type.
+    /// The next box of a type.
     std::optional<MP4Box> find(FourCC type);
 
 private:

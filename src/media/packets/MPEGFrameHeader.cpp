@@ -8,7 +8,7 @@ namespace platform {
 
 namespace {
 
-// By the index in the header, in kilobits per second; 0 is "free format", 15 is no bit rate.
+// Kilobits per second by the header's index; 0 is "free format", 15 is invalid.
 constexpr std::array<std::uint16_t, 15> kBitRatesMPEG1 = {0,   32,  40,  48,  56,  64,  80, 96,
                                                           112, 128, 160, 192, 224, 256, 320};
 constexpr std::array<std::uint16_t, 15> kBitRatesMPEG2 = {0, 8, 16, 24, 32, 40, 48, 56, 64, 80, 96, 112, 128, 144, 160};

@@ -16,18 +16,18 @@ bool begins(BytesView packet, std::string_view text)
     return packet.size() >= text.size() && textOf(packet.first(text.size())) == text;
 }
 
-/// RFC 7845, and RFC 6716, 3.1, for the packets.
+/// RFC 7845, and RFC 6716, 3.1, for packets.
 class OpusCoding final : public OggCoding {
 public:
     static std::unique_ptr<OggCoding> of(BytesView first)
     {
-        // "OpusHead", version 1, channels 1, frames to skip 2, source's rate 4, gain 2, family of mappings 1
+        // "OpusHead", version 1, channels 1, frames to skip 2, source's rate 4, gain 2, mapping family 1
         constexpr std::size_t size = 19;
         if (!begins(first, "OpusHead") || first.size() < size || (first[8] & std::byte{0xF0}) != std::byte{0})
             return nullptr;
         const auto channels = std::to_integer<std::uint32_t>(first[9]);
         const auto family = std::to_integer<unsigned>(first[18]);
-        const bool hasTable = first.size() == size + 2 + channels; // of streams, and of channels among them
+        const bool hasTable = first.size() == size + 2 + channels; // streams, coupled ones, mapping
         const bool isKnown = family == 0 ? channels <= 2 && first.size() == size : family == 1 && hasTable;
         if (!isKnown || speakersOfVorbis(channels) == 0)
             return nullptr;
@@ -60,14 +60,14 @@ private:
     bool hasHeaders_ = false;
 };
 
-/// RFC 9639, 10.1. Each of its packets is a metadata block or a frame.
+/// RFC 9639, 10.1. Each packet is a metadata block or a frame.
 class FLACCoding final : public OggCoding {
 public:
     static std::unique_ptr<OggCoding> of(BytesView first)
     {
         // 0x7F, "FLAC", version 2, number of headers 2, "fLaC", a block's header 4, and the block with its checksum
         constexpr std::size_t size = 51, blockAt = 13;
-        constexpr std::uint32_t streamInfo = 34; // type 0, of so many bytes
+        constexpr std::uint32_t streamInfo = 34; // type 0, of that many bytes
         constexpr std::uint32_t mostBits = 24;
         if (first.size() != size ||
             !begins(first, {"\x7F"
@@ -96,9 +96,9 @@ public:
     std::optional<std::uint32_t> framesOf(BytesView packet) override
     {
         first_.reset();
-        if (packet.empty()) // as some encoders end the stream
+        if (packet.empty()) // some encoders end the stream with it
             return 0;
-        // A decoder takes no frame whose own checksum is wrong, and what a frame says goes ahead of the header.
+        // Decoders reject a frame whose own checksum is wrong, and a frame's fields override the header.
         const auto frame = parseFLACFrame(packet, blockSize_);
         const bool isOfStream = frame && (frame->sampleRate == 0 || frame->sampleRate == format_.sampleRate) &&
                                 frame->channels == format_.channelsPerFrame &&

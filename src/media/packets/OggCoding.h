@@ -1,4 +1,4 @@
-// The codings that Ogg streams hold: what their headers say, and how many frames a packet decodes to.
+// The codings of Ogg streams: what their headers say, and how many frames a packet decodes to.
 #pragma once
 
 #include "media/samples/StreamDescription.h"
@@ -10,10 +10,10 @@
 
 namespace platform {
 
-/// Made for Vorbis, Opus and FLAC.
+/// One for each of Vorbis, Opus and FLAC.
 class OggCoding {
 public:
-    /// By the first packet of a stream; null when it begins no coding that is known here.
+    /// Chosen by the first packet of a stream; null if its coding is unknown.
     static std::unique_ptr<OggCoding> of(BytesView first);
 
     OggCoding() = default;
@@ -24,20 +24,20 @@ public:
     const StreamDescription& format() const { return format_; }
     /// As SoundFacts::speakers.
     std::uint32_t speakers() const { return speakers_; }
-    /// Frames at the start of the stream that are no sound.
+    /// Frames at the start of the stream that do not belong to the sound.
     std::uint32_t primingFrames() const { return priming_; }
 
-    /// Whether packets of sound follow, and no more headers.
+    /// Whether all headers were read, so that packets of sound follow.
     virtual bool hasHeaders() const = 0;
-    /// Takes the next header behind the first; false when it is not the one.
+    /// Reads the next header after the first; false if the packet is another.
     virtual bool takeHeader(BytesView packet) = 0;
-    /// What the packet behind the last one decodes to, also 0; none when it is no packet of sound.
+    /// Number of frames, possibly 0, that the next packet decodes to; none if it is no packet of sound.
     virtual std::optional<std::uint32_t> framesOf(BytesView packet) = 0;
-    /// The next packet is not the one behind the last.
+    /// Announces that the next packet does not follow the last one.
     virtual void leap() {}
-    /// Whether the end of the stream may lie inside its last packet.
+    /// Whether the stream may end inside its last packet.
     virtual bool endsInsidePacket() const { return true; }
-    /// The number of the first frame of the last packet, where it says so.
+    /// Number of the first frame of the last packet, if it says so.
     virtual std::optional<std::uint64_t> firstFrame() const { return {}; }
 
 protected:

@@ -10,14 +10,14 @@ namespace platform {
 
 namespace {
 
-/// The last bytes of a stretch of a file, as many as are needed.
+/// The last bytes of a part of a file, as many as are needed.
 class FileTail {
 public:
-    /// Of the file from `start` to `end`. Does not own it.
+    /// For the part from `start` to `end`. Does not own the file.
     FileTail(PacketFile& file, std::uint64_t start, std::uint64_t end) : file_(file), start_(start), end_(end) {}
 
-    /// Reads so many bytes, then always twice as many; false when all were read before, when they are too many, and
-    /// when they cannot be read, with the status.
+    /// Reads that many bytes, then twice as many at each call. False if all were read before, if they are too many, and
+    /// if they cannot be read, with the status.
     bool grow(std::int32_t& status)
     {
         constexpr std::size_t first = std::size_t{1} << 17, most = std::size_t{1} << 23;
@@ -37,7 +37,7 @@ private:
     Bytes bytes_;
 };
 
-/// More than any coding makes of one; a stream of others has been put together.
+/// More than any coding makes; a stream with more was forged.
 constexpr std::uint64_t kMostFramesPerByte = 8192;
 
 class OggEnds {
@@ -67,19 +67,19 @@ private:
 
     PacketFile& file_;
     std::int32_t status_ = kStatusOK;
-    std::uint64_t next_ = 0; // the place of the next page, and its number
+    std::uint64_t next_ = 0; // position of the next page, and its number
     std::uint32_t number_ = 0;
     std::uint32_t serial_ = 0;
     Bytes page_;
     OggPackets packets_;
     std::unique_ptr<OggCoding> coding_;
     std::uint64_t soundStart_ = 0;
-    std::uint64_t granule_ = 0; // of the last page that counts() was asked about
-    bool isCounted_ = true;     // and it holds
+    std::uint64_t granule_ = 0; // of the last page passed to counts()
+    bool isCounted_ = true;     // it is valid
     std::uint64_t end_ = 0;
 };
 
-/// False at the end, and where there is none of the stream, which the next page must be.
+/// False at the end, and if the next page is not the stream's.
 bool OggEnds::nextPage(OggPage& page)
 {
     const BytesView start = file_.at(next_, OggPage::kHeaderSize + 255);
@@ -102,10 +102,10 @@ bool OggEnds::nextPage(OggPage& page)
     return true;
 }
 
-/// The first page holds the first header and nothing else, and sound begins on a page of its own.
+/// The first page holds only the first header, and sound begins on a new page.
 bool OggEnds::readHeaders()
 {
-    constexpr std::uint64_t most = std::uint64_t{1} << 24; // bytes: there are pictures among the comments
+    constexpr std::uint64_t most = std::uint64_t{1} << 24; // bytes; comments may contain pictures
     OggPage page;
     const auto takeHeader = [&](BytesView packet) {
         if (coding_)
@@ -123,8 +123,8 @@ bool OggEnds::readHeaders()
     return !packets_.isInsidePacket();
 }
 
-/// Whether the page counts what its packets decode to, behind the page ahead; the last one may count less, so that its
-/// last packet is cut. Where the one ahead is not known it only becomes the one that is.
+/// Whether the page's count is that of the page before plus the frames of its packets; the last page may count less,
+/// which cuts its last packet. If the count before is unknown, the page's own becomes known.
 bool OggEnds::counts(const OggPage& page)
 {
     std::uint64_t frames = 0, lastOnPage = 0;
@@ -155,7 +155,7 @@ bool OggEnds::counts(const OggPage& page)
            (page.isLast && coding_->endsInsidePacket() && granule_ < all && granule_ + lastOnPage > all);
 }
 
-/// Up to the page that counts it.
+/// Reads up to the page that counts the first sound.
 bool OggEnds::readFirstSound()
 {
     constexpr std::uint64_t most = std::uint64_t{1} << 20;
@@ -184,7 +184,7 @@ bool OggEnds::readLastPages()
     return false;
 }
 
-/// Whether they follow one another to the end of the stream.
+/// Whether the pages follow one another to the end of the stream.
 bool OggEnds::isRun(std::span<const OggPage> pages, bool areAll)
 {
     packets_ = {};

@@ -1,4 +1,5 @@
-// What an Ogg file (RFC 3533) of one stream of Vorbis, Opus or FLAC says of itself, and whether its pages bear it out.
+// What an Ogg file (RFC 3533) with one stream of Vorbis, Opus or FLAC says about itself, and whether its pages confirm
+// it.
 #pragma once
 
 #include "media/packets/FileEnds.h"
@@ -6,9 +7,9 @@
 
 namespace platform {
 
-/// As describeByEnds. The headers are read, the first packets of sound, and the pages of the last kProvenFrames: there
-/// every checksum must be right and every page's count what its packets decode to; the last one must be marked so, and
-/// end with the file.
+/// As describeByEnds. Reads the headers, the first packets of sound, and the pages of the last kProvenFrames, where
+/// every checksum must be valid and every page must count what its packets decode to; the last page must be marked as
+/// such and end the file.
 std::int32_t readOggInfo(PacketFile& file, CompressedAudio& audio);
 
 } // namespace platform

@@ -11,7 +11,7 @@ namespace {
 
 constexpr std::byte kMostInSegment{255};
 
-/// Of a page, in which the checksum itself counts as zeros.
+/// Checksum of a page, in which its own field counts as zeros.
 std::uint32_t checksumOf(BytesView page, std::size_t at)
 {
     constexpr auto crc = highFirstCRC<32, 0x04C11DB7>;
@@ -61,7 +61,7 @@ bool OggPage::endsPacket() const
 std::vector<OggPage> lastOggPages(BytesView bytes)
 {
     constexpr std::string_view marker = "OggS";
-    constexpr int mostTries = 3; // a marker that begins no page stands by chance in a file of gigabytes, or on purpose
+    constexpr int mostTries = 3; // a marker without a page may occur by chance in gigabytes, or on purpose
     std::vector<OggPage> pages;
     for (int tries = 0; tries < mostTries && pages.empty(); ++tries) {
         const std::size_t at = textOf(bytes).find(marker);

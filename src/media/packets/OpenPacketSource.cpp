@@ -24,7 +24,7 @@ std::unique_ptr<PacketSource> openPacketSource(const std::string& path, std::int
     for (const auto open : {CAFPackets::open, M4APackets::open, ADTSPackets::open, MP3Packets::open}) {
         if (std::unique_ptr<PacketSource> source = open(file, *status))
             return source;
-        if (*status != AudioHandle::kFormatNotSupported || !file) // one that is taken over is of that kind
+        if (*status != AudioHandle::kFormatNotSupported || !file) // a source that took the file over knows its kind
             break;
     }
     return nullptr;

@@ -43,7 +43,7 @@ std::int32_t PacketFile::read(std::uint64_t position, std::uint64_t count, Bytes
     const BytesView found = at(position, size);
     if (found.size() < size) {
         const std::int32_t status = takeStatus();
-        return status != kStatusOK ? status : kStatusEndOfFile; // the file became shorter meanwhile
+        return status != kStatusOK ? status : kStatusEndOfFile; // the file was cut meanwhile
     }
     std::ranges::copy(found, to.begin());
     return kStatusOK;

@@ -1,5 +1,5 @@
-// The bytes of the file that packets are found in: headers, tables and packets are read through one window on it, so
-// that neither a walk over every frame of an hour nor a table of millions of sizes costs many calls.
+// The bytes of a file of packets. Headers, tables and packets are read through one window, so that neither a walk over
+// every frame of an hour nor a table of millions of sizes costs many calls.
 #pragma once
 
 #include "media/containers/FileBytes.h"
@@ -12,19 +12,19 @@ namespace platform {
 
 class PacketFile {
 public:
-    /// What at() can be asked for.
+    /// The most that at() can return.
     static constexpr std::size_t kMostAtOnce = std::size_t{1} << 15;
-    /// A packet of more bytes is none: ALAC's largest, of 16,384 frames of 8 channels, have 512 KiB.
+    /// Larger packets are invalid: ALAC's largest, of 16,384 frames in 8 channels, has 512 KiB.
     static constexpr std::size_t kLargestPacket = std::size_t{1} << 24;
 
-    /// Takes the descriptor over.
+    /// Takes ownership of the descriptor.
     PacketFile(int descriptor, std::uint64_t length) : bytes_(descriptor), length_(length) {}
 
     std::uint64_t length() const { return length_; }
     const FileBytes& bytes() const { return bytes_; }
 
-    /// `count` bytes at `position`, or as many as the file has there; good until the next call of any kind. Fewer also
-    /// when they cannot be read, which takeStatus() then tells.
+    /// `count` bytes at `position`, or as many as the file has there; valid until the next call of any kind. Fewer also
+    /// if they cannot be read, which takeStatus() reports.
     BytesView at(std::uint64_t position, std::size_t count)
     {
         if (position >= windowStart_ && position - windowStart_ <= windowSize_ &&
@@ -33,13 +33,13 @@ public:
         return load(position, count);
     }
 
-    /// Puts `count` bytes at `position` into `to`, all of them or a negative status.
+    /// Reads `count` bytes at `position` into `to`: all of them, or a negative status.
     std::int32_t read(std::uint64_t position, std::uint64_t count, Bytes& to);
 
-    /// That of the first read which failed since this was last asked; kStatusOK when none did.
+    /// Status of the first failed read since the last call; kStatusOK if none failed.
     std::int32_t takeStatus();
-    /// The status of a reader that looked whether the file is of its kind: that of a failed read, or
-    /// kFormatNotSupported when it is not.
+    /// The status for a reader that has checked the file's kind: that of a failed read, or kFormatNotSupported if the
+    /// kind is another.
     std::int32_t takeStatus(bool isOfKind);
 
 private:
@@ -48,7 +48,7 @@ private:
     FileBytes bytes_;
     std::uint64_t length_;
     std::int32_t status_ = 0;
-    Bytes window_; // as long as the largest read so far
+    Bytes window_; // as large as the largest read so far
     std::uint64_t windowStart_ = 0;
     std::size_t windowSize_ = 0;
 };

@@ -1,4 +1,4 @@
-// Where the packets of a stream stand whose container lists their sizes: MP4 and CAF.
+// Positions of the packets in a container that lists their sizes: MP4 and CAF.
 #pragma once
 
 #include <cstddef>
@@ -7,8 +7,8 @@
 
 namespace platform {
 
-/// Sums of sizes, and the runs of packets that stand one behind the other. 8 bytes a packet and 16 a run: 1.3 MB for an
-/// hour of AAC at 44.1 kHz; nothing for packets of one size.
+/// Running sums of sizes, and runs of adjacent packets. Takes 8 bytes per packet and 16 per run: 1.3 MB for an hour of
+/// AAC at 44.1 kHz; nothing for packets of one size.
 class PacketIndex {
 public:
     struct Place {
@@ -16,21 +16,21 @@ public:
         std::uint64_t size = 0; // bytes
     };
 
-    /// All packets have this size, and there is none yet to append.
+    /// Gives all packets one size; none may have been appended.
     void setConstant(std::uint64_t size, std::uint64_t count);
     void append(std::uint32_t size);
-    /// The packets from `first` on stand at `position`; `first` is greater than that of the run before, 0 for the first
-    /// run.
+    /// The packets from `first` on begin at `position`. `first` is greater than that of the run before, and 0 for the
+    /// first run.
     void addRun(std::uint64_t first, std::uint64_t position);
-    /// Forgets all packets from `count` on.
+    /// Drops all packets from `count` on.
     void cut(std::uint64_t count);
 
     std::uint64_t count() const { return count_; }
-    /// The bytes of packets `first` to `end` - 1.
+    /// Total size of packets `first` to `end` - 1.
     std::uint64_t bytes(std::uint64_t first, std::uint64_t end) const { return sum(end) - sum(first); }
-    /// How many packets from `first` on, ahead of `end`, together have no more than `size` bytes.
+    /// How many packets from `first` on, before `end`, fit in `size` bytes together.
     std::uint64_t countFitting(std::uint64_t first, std::uint64_t end, std::uint64_t size) const;
-    /// Where a packet below count() stands, once it is in a run.
+    /// Position of a packet below count(), once it is in a run.
     Place place(std::uint64_t packet) const;
 
 private:
@@ -38,7 +38,7 @@ private:
         std::uint64_t first, position;
     };
 
-    /// Of the sizes of all packets ahead of one.
+    /// Total size of all packets before one.
     std::uint64_t sum(std::uint64_t packet) const
     {
         return constantSize_ > 0 ? packet * constantSize_
@@ -46,9 +46,9 @@ private:
                                  : sums_[static_cast<std::size_t>(packet - 1)];
     }
 
-    std::uint64_t constantSize_ = 0; // 0: they differ
+    std::uint64_t constantSize_ = 0; // 0 if sizes differ
     std::uint64_t count_ = 0;
-    std::vector<std::uint64_t> sums_; // each with its packet's own size
+    std::vector<std::uint64_t> sums_; // each includes its packet
     std::vector<Run> runs_;
 };
 

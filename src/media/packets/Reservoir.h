@@ -8,13 +8,13 @@
 
 namespace platform {
 
-/// Packets to decode ahead of `packet`, of a stream whose frames have headers like `any`: `mainDataSize(i)` is what
-/// packet i holds of main data, in bytes, and is asked going backwards.
+/// Number of packets to decode before `packet`, in a stream with frame headers like `any`. `mainDataSize(i)` is the
+/// size in bytes of packet i's main data, and is called for descending i.
 template <class MainDataSize>
 std::uint64_t mp3PreRoll(std::uint64_t packet, const MPEGFrameHeader& any, MainDataSize mainDataSize)
 {
     constexpr std::uint64_t kLeast = 10;
-    constexpr std::uint64_t kSynthesis = 2; // overlap, and the history of the filterbank: a granule each, one a packet
+    constexpr std::uint64_t kSynthesis = 2; // overlap and filterbank history: one packet each
     std::uint64_t ahead = std::min(kSynthesis, packet);
     for (std::uint32_t reached = 0; reached < any.reservoirSize() && ahead < packet; ++ahead)
         reached += mainDataSize(packet - ahead - 1);

@@ -11,10 +11,10 @@ namespace platform {
 
 namespace {
 
-/// A box of entries of one size behind a count.
+/// A box of fixed-size entries after a count.
 class Entries {
 public:
-    /// `countOffset` is where the body has the count, which the entries follow.
+    /// `countOffset` is the position of the count in the body; the entries follow it.
     Entries(PacketFile& file, const std::optional<MP4Box>& box, std::uint64_t countOffset, std::size_t entrySize)
         : file_(file),
           entrySize_(entrySize)
@@ -29,10 +29,10 @@ public:
         isSound_ = (box->end - start_) / entrySize >= count_;
     }
 
-    /// False when there is no such box, or one with fewer entries than it counts.
+    /// False if there is no such box, or if it has fewer entries than it counts.
     bool isSound() const { return isSound_; }
     std::uint32_t count() const { return isSound_ ? count_ : 0; }
-    /// An entry's bytes, good until the next call; empty when they cannot be read.
+    /// An entry's bytes, valid until the next call; empty if they cannot be read.
     BytesView at(std::uint64_t i)
     {
         const BytesView bytes = file_.at(start_ + i * entrySize_, entrySize_);
@@ -192,7 +192,7 @@ private:
             if (there > 0)
                 packets.addRun(packet, position);
             packet += there;
-            if (packet < end) { // the file was cut short
+            if (packet < end) { // the file was cut
                 packets.cut(packet);
                 return kStatusOK;
             }

@@ -1,4 +1,4 @@
-// The tables of a track that say where its packets stand and how long they last (ISO/IEC 14496-12, 8.6 and 8.7).
+// The tables of a track with the positions and durations of its packets (ISO/IEC 14496-12, 8.6 and 8.7).
 #pragma once
 
 #include "media/packets/MP4Boxes.h"
@@ -10,18 +10,18 @@
 namespace platform {
 
 struct SampleTable {
-    PacketIndex packets;             // those that the file holds to the last byte
-    std::uint64_t statedPackets = 0; // those that its tables list
-    std::uint32_t duration = 0;      // of each packet but the last, in units of the track
-    std::uint32_t lastDuration = 0;  // of the last one listed, not longer
+    PacketIndex packets;             // the packets that the file holds completely
+    std::uint64_t statedPackets = 0; // the packets that the tables list
+    std::uint32_t duration = 0;      // per packet but the last, in the track's units
+    std::uint32_t lastDuration = 0;  // of the last packet listed, not longer
 
-    /// Of the packets that are there.
+    /// Of the packets that are present.
     std::uint64_t totalDuration() const;
-    /// Of those that the tables list.
+    /// Of the packets that the tables list.
     std::uint64_t statedDuration() const;
 
-    /// From the box "stbl". kFormatNotSupported when packets differ in duration or the stream changes its coding,
-    /// kStatusIOError when the tables contradict each other.
+    /// Reads the box "stbl". kFormatNotSupported if packets differ in duration or the stream changes its coding,
+    /// kStatusIOError if the tables contradict each other.
     static std::int32_t read(PacketFile& file, const MP4Box& box, SampleTable& table);
 };
 

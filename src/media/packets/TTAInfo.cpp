@@ -15,7 +15,7 @@ namespace {
 
 constexpr std::size_t kCRCSize = 4;
 
-/// Whether the last of the bytes are the checksum of the others.
+/// Whether the last bytes are the checksum of the others.
 bool isRight(BytesView bytes)
 {
     if (bytes.size() <= kCRCSize)
@@ -42,7 +42,7 @@ private:
     bool readHeader(CompressedAudio& audio);
     bool findFrames(std::uint64_t count);
     bool areFramesRight();
-    /// Reads bytes that end with their checksum.
+    /// Reads bytes that end with their checksum, and compares it.
     bool readRight(std::uint64_t position, std::uint64_t size)
     {
         if (size > PacketFile::kLargestPacket)
@@ -56,7 +56,7 @@ private:
     Bytes bytes_;
     std::uint64_t framesInOne_ = 0;
     std::uint64_t next_ = 0;
-    std::vector<std::uint64_t> ends_; // of TTA's frames, the first of which begins at the first of these
+    std::vector<std::uint64_t> ends_; // ends of TTA's frames; the first entry is the start of the first
 };
 
 bool TTAEnds::readHeader(CompressedAudio& audio)
@@ -64,7 +64,8 @@ bool TTAEnds::readHeader(CompressedAudio& audio)
     // "TTA1", coding 2, channels 2, bits 2, rate 4, frames 4, checksum 4
     constexpr std::size_t size = 22;
     constexpr std::uint32_t mostRate = 1000000;
-    // By channels; of one decoders do not say where it is, and five they do not take.
+    // Indexed by channels; 0 for one channel, whose speaker decoders do not name, and for five, which they do not
+    // accept.
     constexpr std::array<std::uint32_t, 9> speakers{0, 0, 0x3, 0xB, 0x33, 0, 0x3F, 0x13F, 0x6CF};
     next_ = endOfLeadingTags(file_);
     if (!readRight(next_, size) || textOf(BytesView(bytes_).first(4)) != "TTA1")
@@ -86,7 +87,7 @@ bool TTAEnds::readHeader(CompressedAudio& audio)
     return isUsual;
 }
 
-/// By the table of their sizes.
+/// Reads the table of frame sizes.
 bool TTAEnds::findFrames(std::uint64_t count)
 {
     const std::uint64_t frames = (count + framesInOne_ - 1) / framesInOne_;
@@ -103,7 +104,7 @@ bool TTAEnds::findFrames(std::uint64_t count)
 bool TTAEnds::areFramesRight()
 {
     const std::size_t frames = ends_.size() - 1;
-    const std::uint64_t wanted = kProvenFrames / framesInOne_ + 2; // the last one may be short
+    const std::uint64_t wanted = kProvenFrames / framesInOne_ + 2; // the last frame may be short
     for (std::size_t i = 0; i < frames; ++i)
         if ((i == 0 || i + wanted >= frames) && !readRight(ends_[i], ends_[i + 1] - ends_[i]))
             return false;

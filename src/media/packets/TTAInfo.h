@@ -1,5 +1,5 @@
-// What a TTA1 file (tausoft.org, "True Audio codec: format description") says of itself, and whether its frames bear it
-// out.
+// What a TTA1 file (tausoft.org, "True Audio codec: format description") says about itself, and whether its frames
+// confirm it.
 #pragma once
 
 #include "media/packets/FileEnds.h"
@@ -7,8 +7,8 @@
 
 namespace platform {
 
-/// As describeByEnds. Header, table of frames, the first frame, and those of the last kProvenFrames must have the right
-/// checksums; all frames together must fill the file between its tags.
+/// As describeByEnds. The header, the table of frames, the first frame and those of the last kProvenFrames must have
+/// valid checksums; all frames together must fill the file between its tags.
 std::int32_t readTTAInfo(PacketFile& file, CompressedAudio& audio);
 
 } // namespace platform

@@ -10,14 +10,14 @@ namespace {
 
 constexpr std::size_t kID3v2HeaderSize = 10;
 constexpr std::size_t kID3v1Size = 128;
-constexpr std::size_t kAPEFooterSize = 32; // and of the header, which is optional
+constexpr std::size_t kAPEFooterSize = 32; // also of the optional header
 
 bool is(BytesView bytes, std::string_view text)
 {
     return bytes.size() >= text.size() && textOf(bytes.first(text.size())) == text;
 }
 
-/// The bytes of the tag that ends at `end`; 0 when there is none.
+/// Size of the tag that ends at `end`; 0 if there is none.
 std::uint64_t trailingTagSize(PacketFile& file, std::uint64_t start, std::uint64_t end)
 {
     if (end - start >= kID3v1Size && is(file.at(end - kID3v1Size, kID3v1Size), "TAG"))
@@ -27,7 +27,7 @@ std::uint64_t trailingTagSize(PacketFile& file, std::uint64_t start, std::uint64
     const BytesView footer = file.at(end - kAPEFooterSize, kAPEFooterSize);
     if (footer.size() < kAPEFooterSize || !is(footer, "APETAGEX"))
         return 0;
-    const std::uint64_t size = loadLE<std::uint32_t>(footer.data() + 12); // the footer included, the header not
+    const std::uint64_t size = loadLE<std::uint32_t>(footer.data() + 12); // includes the footer but not the header
     const bool hasHeader = loadLE<std::uint32_t>(footer.data() + 20) >> 31;
     const std::uint64_t whole = size + (hasHeader ? kAPEFooterSize : 0);
     return size >= kAPEFooterSize && whole <= end - start ? whole : 0;

@@ -10,18 +10,18 @@ namespace platform {
 
 namespace {
 
-/// The frames that an edit lets be heard of `rest`, those behind its start.
+/// How many of `rest`, the frames after an edit's start, the edit makes audible.
 std::uint64_t heardFrames(const TrackFrames& frames, std::uint64_t duration, std::uint64_t rest)
 {
     if (duration == 0 || frames.movieTimescale == 0)
         return rest;
-    // The movie's unit is mostly a millisecond: an edit that ends within one of the track's end ends there.
+    // The movie's unit is usually a millisecond, so an edit that ends within one unit of the track's end ends there.
     const double unit = static_cast<double>(frames.sampleRate) / frames.movieTimescale;
     const double heard = static_cast<double>(duration) * unit;
     return heard + unit + 1 >= static_cast<double>(rest) ? rest : static_cast<std::uint64_t>(std::llround(heard));
 }
 
-/// Whether the numbers add up to the packets that the file lists; the last of them may have fewer frames.
+/// Whether the numbers add up to the packets that the file lists; the last packet may have fewer frames.
 bool fits(const GaplessItem& item, const TrackFrames& frames)
 {
     const std::uint64_t around = std::uint64_t{item.priming} + item.remainder;

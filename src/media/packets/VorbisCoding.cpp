@@ -6,13 +6,13 @@ namespace platform {
 
 namespace {
 
-/// Bits of a packet from its last towards its first.
+/// Reads a packet's bits from its end to its start.
 class BitsBackwards {
 public:
     explicit BitsBackwards(BytesView bytes) : bytes_(bytes), left_(bytes.size() * 8) {}
 
     std::size_t left() const { return left_; }
-    /// The `count` bits ahead of those taken, as the number that was written; there are as many.
+    /// The `count` bits before those taken so far, as the number that was written; there are enough.
     std::uint32_t take(unsigned count)
     {
         std::uint32_t value = 0;
@@ -77,18 +77,18 @@ bool VorbisCoding::takeHeader(BytesView packet)
     return isHeader(packet, headers_ == 2 ? comments : setup) && (headers_ < 3 || readModes(packet));
 }
 
-/// Modes stand last in the setup header, behind codebooks that need not be understood: each has 1 bit that says whether
-/// its block is long, 16 of window and 16 of transform, all zeros, and 8 of mapping; 6 ahead of them say how many there
-/// are, less one. The bits of a mode's mapping may be mistaken for these, so that the largest number counts. Encoders
-/// make one or two; where there seem to be more, this is in doubt.
+/// Finds the modes, which end the setup header, without parsing the codebooks before them. Each mode has a bit that
+/// tells whether its block is long, 16 for the window and 16 for the transform, all zeros, and 8 for the mapping; the 6
+/// bits before the modes are their number less one. Mapping bits may look like that number, so the largest match wins.
+/// Encoders make one or two modes; more are in doubt.
 bool VorbisCoding::readModes(BytesView setup)
 {
     constexpr std::size_t modeBits = 41, countBits = 6;
     constexpr std::uint32_t mostMapping = 63;
     BitsBackwards bits(setup);
-    while (bits.left() > 0 && bits.take(1) == 0) // up to the bit that ends the header
+    while (bits.left() > 0 && bits.take(1) == 0) // up to the framing bit
         continue;
-    std::array<bool, 64> flags{}; // of the last mode first
+    std::array<bool, 64> flags{}; // last mode first
     std::size_t found = 0;
     for (std::size_t i = 0; i < flags.size() && bits.left() > modeBits + countBits; ++i) {
         if (bits.take(8) > mostMapping || bits.take(16) != 0 || bits.take(16) != 0)
@@ -108,7 +108,7 @@ std::optional<std::uint32_t> VorbisCoding::framesOf(BytesView packet)
 {
     if (packet.empty() || (std::to_integer<unsigned>(packet[0]) & 1) != 0) // a header
         return {};
-    // Bits: 0, the mode, if there are two, and of long blocks whether the ones ahead and behind are long.
+    // Bits: 0, the mode if there are two, and for long blocks whether the neighbours are long.
     const auto bits = std::to_integer<unsigned>(packet[0]) >> 1;
     const bool isLong = isLong_[hasTwoModes_ ? bits & 1 : 0];
     const std::uint32_t size = blockSizes_[isLong ? 1 : 0];

@@ -7,10 +7,10 @@
 
 namespace platform {
 
-/// A packet gives a quarter of the two block sizes, of its own block and of the one ahead; the first gives nothing.
+/// A packet yields a quarter of the sum of its block size and the one before; the first yields nothing.
 class VorbisCoding final : public OggCoding {
 public:
-    /// Null when the packet is no identification header.
+    /// Null if the packet is no identification header.
     static std::unique_ptr<OggCoding> of(BytesView first);
 
     bool hasHeaders() const override { return headers_ == 3; }
@@ -23,12 +23,12 @@ private:
 
     int headers_ = 1;
     std::array<std::uint32_t, 2> blockSizes_{}; // short and long
-    std::array<bool, 2> isLong_{};              // by mode
+    std::array<bool, 2> isLong_{};              // indexed by mode
     bool hasTwoModes_ = false;
-    std::uint32_t previous_ = 0; // the size of the last packet's block; 0 when it is not known
+    std::uint32_t previous_ = 0; // size of the last packet's block; 0 if unknown
 };
 
-/// The speakers of so many channels, up to 8, in Vorbis and Opus; 0 for more.
+/// The speakers of up to 8 channels in Vorbis and Opus; 0 for more.
 std::uint32_t speakersOfVorbis(std::uint32_t channels);
 
 } // namespace platform

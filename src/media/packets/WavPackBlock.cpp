@@ -8,7 +8,7 @@ namespace platform {
 
 namespace {
 
-/// Of the 16-bit words ahead of its own part.
+/// Checksum over the 16-bit words before its own part.
 std::uint32_t checksumOf(BytesView bytes)
 {
     std::uint32_t sum = ~0U;
@@ -43,7 +43,7 @@ std::optional<WavPackBlock> WavPackBlock::parseHeader(BytesView header)
     if (block.size < kHeaderSize || block.size > kMostSize || version < oldest || version > newest)
         return {};
     block.first = number(16) | high(10);
-    if (number(12) != 0xFFFFFFFF) // which says that it is not known, so that there is one number less in every 2^32
+    if (number(12) != 0xFFFFFFFF) // means unknown, so every 2^32 has one number less
         block.total = number(12) + high(11) - (high(11) >> 32);
     block.frames = static_cast<std::uint32_t>(number(20));
     const auto flags = static_cast<std::uint32_t>(number(24));
@@ -64,8 +64,8 @@ std::optional<WavPackBlock> WavPackBlock::parse(BytesView bytes)
     return block && block->size == bytes.size() && block->readParts(bytes) ? block : std::nullopt;
 }
 
-/// Behind the header stand parts, which must fill the block; the last one is the checksum. A part has its kind 1, the
-/// number of 16-bit words 1 or 3, and these, the last of which may be half used.
+/// Reads the parts after the header, which must fill the block; the last is the checksum. A part has its kind 1, the
+/// number of 16-bit words 1 or 3, and the words, of which the last may be half used.
 bool WavPackBlock::readParts(BytesView block)
 {
     constexpr unsigned kindMask = 0x3F, isHalfUsed = 0x40, isLarge = 0x80;
@@ -98,7 +98,7 @@ bool WavPackBlock::readParts(BytesView block)
     return false;
 }
 
-/// Their number, and a mask of 1 to 4 bytes; files of more than 255 have more.
+/// The number of channels and a mask of 1 to 4 bytes; more for over 255 channels.
 bool WavPackBlock::readChannels(BytesView part)
 {
     if (part.size() < 2 || part.size() > 5)

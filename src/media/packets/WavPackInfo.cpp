@@ -13,7 +13,7 @@ namespace platform {
 
 namespace {
 
-constexpr std::uint32_t kMostFrames = 1u << 17; // of a block, as encoders write them
+constexpr std::uint32_t kMostFrames = 1u << 17; // per block, as encoders write them
 
 class WavPackEnds {
 public:
@@ -44,12 +44,12 @@ private:
     PacketFile& file_;
     std::int32_t status_ = kStatusOK;
     std::vector<Place> places_; // of blocks with sound
-    std::uint64_t frames_ = 0;  // of these
-    bool isInside_ = false;     // blocks of the same frames are to follow
-    WavPackBlock last_, first_; // of those with sound
+    std::uint64_t frames_ = 0;  // in these
+    bool isInside_ = false;     // more blocks of the same frames follow
+    WavPackBlock last_, first_; // with sound
 };
 
-/// Whether blocks with sound follow one another, each for all of its channels.
+/// Whether blocks with sound follow one another, each time for all channels.
 bool WavPackEnds::follows(const WavPackBlock& block)
 {
     if (block.isInitial == isInside_ || block.isDSD || block.frames > kMostFrames ||
@@ -61,7 +61,7 @@ bool WavPackEnds::follows(const WavPackBlock& block)
     return true;
 }
 
-/// From header to header, each of which costs a read of its own, as blocks are longer than a window.
+/// Walks from header to header; each costs a read, because blocks are longer than a window.
 bool WavPackEnds::walk()
 {
     constexpr std::size_t mostBlocks = 1u << 17;
@@ -80,7 +80,7 @@ bool WavPackEnds::walk()
     return at == end && !isInside_ && frames_ > 0;
 }
 
-/// Whether the first blocks and the last ones have the right checksums, and the first one knows of all frames.
+/// Whether the first and last blocks have valid checksums, and the first knows the number of all frames.
 bool WavPackEnds::isProven()
 {
     constexpr std::uint32_t mostChannels = 32;
@@ -100,7 +100,7 @@ bool WavPackEnds::isProven()
 
 void WavPackEnds::tell(CompressedAudio& audio) const
 {
-    constexpr std::uint32_t inWAVE = 0x3FFFF; // speakers that every mask numbers alike
+    constexpr std::uint32_t inWAVE = 0x3FFFF; // bits that every mask numbers alike
     audio = {};
     audio.fileType = audio.format.formatId = fourCC("wvpk");
     audio.format.sampleRate = first_.sampleRate;

@@ -49,11 +49,11 @@ void storeInteger(Byte* to, std::int32_t value)
     }
 }
 
-// 2^(bits-1): what full scale is multiplied by.
+// 2^(bits-1), the factor of full scale.
 template <int Bytes>
 constexpr float kFullScale = static_cast<float>(std::uint32_t{1} << (8 * Bytes - 1));
 
-// Half to even, in the rounding mode that every thread starts with; clamped. A NaN is silence.
+// Rounds half to even in the rounding mode that every thread starts with, and clamps. A NaN becomes silence.
 template <int Bytes>
 std::int32_t rounded(float sample)
 {
@@ -71,7 +71,7 @@ std::int32_t rounded(float sample)
 template <bool isBig>
 constexpr std::endian kOrder = isBig ? std::endian::big : std::endian::little;
 
-// Each kind converts one sample between a format of `size` bytes and a float.
+// Each kind converts one sample of `size` bytes to or from a float.
 template <int Bytes, bool isBig, bool isUnsigned>
 struct Integers {
     static constexpr std::size_t size = Bytes;

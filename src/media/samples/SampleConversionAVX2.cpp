@@ -16,11 +16,11 @@ KT_VECTORS inline void store16(Byte* to, __m128i value)
     _mm_storeu_si128(reinterpret_cast<__m128i*>(to), value);
 }
 
-// Eight samples, left-aligned or not: `kScale` brings them to [-1, 1).
+// Eight samples, left-aligned or not; `kScale` brings them to [-1, 1).
 template <int Bytes, bool Big, bool Unsigned>
 struct Integers {
     static constexpr std::size_t size = Bytes;
-    // 24 bits stand in the upper bytes of their lanes, where converting them is exact.
+    // 24-bit samples are in the upper bytes of their lanes, where conversion is exact.
     static constexpr int laneBits = Bytes == 3 ? 32 : 8 * Bytes;
     static constexpr float scale = 1.0F / static_cast<float>(std::uint32_t{1} << (laneBits - 1));
 
@@ -45,7 +45,7 @@ struct Integers {
         _mm256_storeu_ps(to, _mm256_mul_ps(_mm256_cvtepi32_ps(lanes(from)), _mm256_set1_ps(scale)));
     }
 
-    // Rounds half to even, clamps, makes NaN 0: eight integers.
+    // Eight integers, rounded half to even and clamped; a NaN becomes 0.
     KT_VECTORS static inline __m256i rounded(const float* from)
     {
         constexpr float full = static_cast<float>(std::uint32_t{1} << (8 * Bytes - 1));
@@ -54,8 +54,7 @@ struct Integers {
         const __m256 above = _mm256_max_ps(numbers, _mm256_set1_ps(-full));
         if constexpr (Bytes < 4)
             return _mm256_cvtps_epi32(_mm256_min_ps(above, _mm256_set1_ps(full - 1)));
-        // The highest of 32 bits is no float: what is too large converts to 0x80000000, whose complement is the
-        // highest.
+        // 2^31 - 1 is no float: a value that is too large converts to 0x80000000, whose complement is that number.
         const __m256 tooLarge = _mm256_cmp_ps(above, _mm256_set1_ps(full), _CMP_GE_OQ);
         return _mm256_xor_si256(_mm256_cvtps_epi32(above), _mm256_castps_si256(tooLarge));
     }
@@ -70,7 +69,7 @@ struct Integers {
             const __m128i big = _mm_setr_epi8(2, 1, 0, 6, 5, 4, 10, 9, 8, 14, 13, 12, -1, -1, -1, -1);
             const __m256i packed = _mm256_shuffle_epi8(values, _mm256_broadcastsi128_si256(Big ? big : little));
             const __m128i second = _mm256_extracti128_si256(packed, 1);
-            store16(to, _mm256_castsi256_si128(packed)); // its last 4 bytes are overwritten
+            store16(to, _mm256_castsi256_si128(packed)); // the next store overwrites its last 4 bytes
             _mm_storel_epi64(reinterpret_cast<__m128i*>(to + 12), second);
             _mm_storeu_si32(to + 20, _mm_srli_si128(second, 8));
         } else {

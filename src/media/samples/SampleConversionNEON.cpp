@@ -13,11 +13,11 @@ namespace {
 
 using namespace neon;
 
-// Eight samples, left-aligned or not: the point stands ahead of all bits but the sign.
+// Eight samples, left-aligned or not; as fixed-point numbers they have no bits before the point but the sign.
 template <int Bytes, bool Big, bool Unsigned>
 struct Integers {
     static constexpr std::size_t size = Bytes;
-    // 24 bits stand in the upper bytes of their lanes, where converting them is exact.
+    // 24-bit samples are in the upper bytes of their lanes, where conversion is exact.
     static constexpr int laneBits = Bytes == 3 ? 32 : 8 * Bytes;
 
     static inline int32x4x2_t lanes(const Byte* from)
@@ -47,7 +47,7 @@ struct Integers {
         vst1q_f32(to + 4, vcvtq_n_f32_s32(samples.val[1], laneBits - 1));
     }
 
-    // Rounds half to even, clamps to 32 bits, makes NaN 0: four integers.
+    // Four integers, rounded half to even and clamped to 32 bits; a NaN becomes 0.
     static inline int32x4_t rounded(const float* from)
     {
         constexpr float full = static_cast<float>(std::uint32_t{1} << (8 * Bytes - 1));

@@ -8,7 +8,7 @@
 namespace platform {
 namespace {
 
-// Comparisons that a NaN fails, so that it counts as nothing.
+// A NaN fails both comparisons and so is ignored.
 void fold(const float* samples, std::size_t count, SampleExtremes& extremes)
 {
     for (std::size_t i = 0; i < count; ++i) {
@@ -25,7 +25,7 @@ void sampleExtremesPlain(const void* samples, SampleFormat format, std::size_t s
                          SampleExtremes* to)
 {
     const auto* from = static_cast<const unsigned char*>(samples);
-    std::array<float, 512> floats; // an even number, so that each piece begins at an even place
+    std::array<float, 512> floats; // an even number, so that each piece starts with an even sample
     for (std::size_t run = 0; run < runs; ++run) {
         to[run] = {};
         for (std::size_t left = samplesPerRun; left > 0;) {

@@ -1,5 +1,5 @@
-// Samples are compared as they are stored, in vectors of their own width, and only the extremes of a run become floats:
-// that conversion keeps their order, rounding included, so the result is that of converting first.
+// Compares samples as they are stored, in vectors of their own width, and converts only the extremes of a run to
+// floats. Conversion preserves order, rounding included, so the result is the same as converting first.
 #include "media/samples/SampleExtremesAVX2.h"
 
 #if defined(KT_AVX2)

@@ -1,4 +1,4 @@
-// Extremes in the vectors of AVX2, which those of AVX-512 are brought down to. For their .cpp files only.
+// Extremes in AVX2 vectors, to which AVX-512 vectors are reduced too. For their .cpp files only.
 #pragma once
 
 #include "media/samples/SampleLanesAVX2.h"
@@ -9,8 +9,8 @@
 
 namespace platform::avx2 {
 
-// The kinds, whose pairs are the two lower floats. Where a shift fills up with zeros it does no harm, as zero counts
-// anyway.
+// The sample kinds; their pairs are the two lower floats. Zeros that a shift brings in do no harm, because zero always
+// counts.
 struct Pairs {
     KT_VECTORS static inline void store(float* to, __m128 first, __m128 second)
     {
@@ -18,7 +18,7 @@ struct Pairs {
     }
 };
 
-// `Bits` of a lane; 24-bit samples stand in lanes of 32.
+// Integers of `Bits` bits per lane; 24-bit samples have 32-bit lanes.
 template <int Bits>
 struct IntegerLanes : Pairs {
     using Vector = __m256i;
@@ -76,7 +76,7 @@ struct Integers : IntegerLanes<Bytes == 3 ? 32 : 8 * Bytes> {
     }
 };
 
-// Of a NaN and a number, `lower` and `higher` choose their second argument.
+// Given a NaN and a number, `lower` and `higher` return their second argument.
 template <bool Big>
 struct Floats : Pairs {
     using Vector = __m256;

@@ -1,9 +1,9 @@
-// Extremes as SampleExtremesAVX2.cpp finds them, in vectors of twice the width.
+// Finds extremes like SampleExtremesAVX2.cpp, in vectors of twice the width.
 #include "media/samples/SampleExtremesAVX2.h"
 
 #if defined(KT_AVX2)
 
-// What is marked from here on belongs to this file alone; the headers above stay as AVX2 has them.
+// From here on, functions are marked for AVX-512; the headers above keep AVX2.
 #undef KT_VECTORS
 #define KT_VECTORS __attribute__((target("avx512f,avx512bw,avx512vbmi")))
 
@@ -15,12 +15,11 @@
 #include <cstring>
 
 namespace platform {
-namespace avx512 { // not without a name, by which the linker would take the roads of different files for the same
+namespace avx512 { // not unnamed: the linker would merge equal roads of different files
 
 using avx2::Byte;
 
-// In each lane of `size` bytes the place of the byte that goes there, from a record of `Bytes` that fills its upper
-// ones.
+// For each lane of `size` bytes, the source position of its bytes; a record of `Bytes` bytes fills the upper ones.
 template <int Bytes, bool Big, std::size_t size = Bytes == 3 ? 4 : Bytes>
 constexpr auto placesInLanes()
 {
@@ -38,14 +37,14 @@ KT_VECTORS inline __m512i load64(const Byte* from)
     alignas(64) static constexpr auto places = placesInLanes<Bytes, Big>();
     if constexpr (Bytes == 3)
         return _mm512_maskz_permutexvar_epi8(0xEEEE'EEEE'EEEE'EEEE, _mm512_load_si512(places.data()),
-                                             _mm512_maskz_loadu_epi8(0xFFFF'FFFF'FFFF, from)); // 48 bytes, none beyond
+                                             _mm512_maskz_loadu_epi8(0xFFFF'FFFF'FFFF, from)); // none beyond 48
     else if constexpr (Big)
         return _mm512_permutexvar_epi8(_mm512_load_si512(places.data()), _mm512_loadu_si512(from));
     else
         return _mm512_loadu_si512(from);
 }
 
-// What the kinds have of that of AVX2: their extremes are brought down to one of its vectors, and by it further.
+// What the kinds share with AVX2: extremes are reduced to one AVX2 vector, which reduces them further.
 template <class Half>
 struct Twice : Half {
     using HalfVector = typename Half::Vector;

@@ -21,7 +21,7 @@ struct Pairs {
     }
 };
 
-// `Bits` of a lane; 24-bit samples stand in lanes of 32.
+// Integers of `Bits` bits per lane; 24-bit samples have 32-bit lanes.
 template <int Bits>
 struct IntegerLanes : Pairs {
     using Vector = std::conditional_t<Bits == 8, int8x16_t, std::conditional_t<Bits == 16, int16x8_t, int32x4_t>>;
@@ -45,7 +45,7 @@ struct IntegerLanes : Pairs {
         else
             return vmaxq_s32(a, b);
     }
-    // Moves the lanes of the upper bytes down.
+    // Moves the upper lanes' bytes down.
     template <int Bytes>
     static inline Vector moved(Vector value)
     {
@@ -82,8 +82,8 @@ struct Integers : IntegerLanes<Bytes == 3 ? 32 : 8 * Bytes> {
     }
 };
 
-// Of a NaN and a number, `lower` and `higher` choose their second argument. The instructions for that, vminnm and
-// vmaxnm, would give a NaN for a signalling one.
+// Given a NaN and a number, `lower` and `higher` return their second argument. The dedicated instructions vminnm and
+// vmaxnm would return a NaN for a signalling one.
 template <bool Big>
 struct Floats : Pairs {
     using Vector = float32x4_t;

@@ -1,5 +1,5 @@
-// From a format, which is known when the library runs, to code that is compiled for it. For the .cpp files of the
-// roads over samples only.
+// Dispatches from a format, known at run time, to code compiled for it. For the .cpp files of the roads over samples
+// only.
 #pragma once
 
 #include "media/samples/SampleConversion.h"
@@ -8,8 +8,8 @@
 
 namespace platform {
 
-/// `Road<Kind>::run` of the kind that is `format`, one of Integers<bytes, isBig, isUnsigned>, Floats<isBig> and
-/// Doubles<isBig>; the one place that knows all of them.
+/// Calls `Road<Kind>::run` with the kind that `format` is, one of Integers<bytes, isBig, isUnsigned>, Floats<isBig> and
+/// Doubles<isBig>; the only place that knows all of them.
 template <template <class> class Road, template <int, bool, bool> class Integers, template <bool> class Floats,
           template <bool> class Doubles>
 auto roadOf(SampleFormat format)

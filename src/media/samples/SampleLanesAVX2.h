@@ -1,4 +1,4 @@
-// Samples brought into the lanes of vectors: what the fast roads by AVX2 have in common. For their .cpp files only.
+// Loads samples into vector lanes, for the fast roads with AVX2. For their .cpp files only.
 #pragma once
 
 #include "media/samples/SampleVectors.h"

@@ -9,7 +9,7 @@ namespace platform {
 bool hasFastRoads()
 {
     static const bool hasAVX2 = [] {
-        __builtin_cpu_init(); // may run ahead of the constructor that does it
+        __builtin_cpu_init(); // this may run before the constructor that does it
         return __builtin_cpu_supports("avx2") != 0;
     }();
     return hasAVX2;
@@ -19,7 +19,7 @@ bool hasFastRoads()
 
 bool hasFastRoads()
 {
-    return true; // every processor of this architecture
+    return true; // all processors of this architecture have it
 }
 
 #else

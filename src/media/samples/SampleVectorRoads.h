@@ -1,4 +1,4 @@
-// The fast roads over samples as far as they are the same in all vectors. For their .cpp files only.
+// The part of the fast roads that is the same for all vectors. For their .cpp files only.
 #pragma once
 
 #include "media/samples/SampleExtremes.h"
@@ -8,10 +8,10 @@
 
 namespace platform {
 
-// Conversions take two steps to a round: rounds of one step are so few instructions that a processor's rate over them
-// changes by a third with the address at which a linker puts them.
+// Conversions unroll two steps: a loop of one step has so few instructions that its speed varies by a third with the
+// address where a linker places it.
 
-/// Converts eight samples at a time by Kind::read; returns how many.
+/// Converts eight samples at a time with Kind::read; returns their number.
 template <class Kind>
 struct VectorReader {
     KT_VECTORS static std::size_t run(const void* samples, float* to, std::size_t count)
@@ -25,7 +25,7 @@ struct VectorReader {
     }
 };
 
-/// The other way, by Kind::write.
+/// The reverse, with Kind::write.
 template <class Kind>
 struct VectorWriter {
     KT_VECTORS static std::size_t run(const float* from, void* samples, std::size_t count)
@@ -39,8 +39,8 @@ struct VectorWriter {
     }
 };
 
-/// Kind::Vector holds Kind::step samples in its lanes, an even number of them. Kind::evenAndOdd brings a vector of
-/// extremes down to those of its even and of its odd lanes, as floats; Kind::store stores two such pairs.
+/// Kind::Vector holds Kind::step samples in its lanes, an even number. Kind::evenAndOdd reduces a vector of extremes to
+/// those of its even and odd lanes as floats; Kind::store stores two such pairs.
 template <class Kind>
 struct VectorExtremes {
     using Byte = unsigned char;
@@ -66,7 +66,7 @@ struct VectorExtremes {
         const std::size_t vectors = samplesPerRun / Kind::step;
         const std::size_t rest = samplesPerRun % Kind::step;
         for (std::size_t i = 0; i < runs; ++i) {
-            Lanes first, second; // so that one comparison need not wait for the one before
+            Lanes first, second; // so that consecutive comparisons need not wait for each other
             for (std::size_t fours = vectors / 4; fours > 0; --fours, from += 4 * vector) {
                 first.add(from);
                 second.add(from + vector);
@@ -85,9 +85,9 @@ struct VectorExtremes {
             }
         }
     }
-    static_assert(sizeof(SampleExtremes) == 4 * sizeof(float)); // the four are stored at once
+    static_assert(sizeof(SampleExtremes) == 4 * sizeof(float)); // all four are stored at once
 
-    // What is left behind the last whole vector.
+    // Adds the samples after the last whole vector.
     static void addRest(const Byte* from, SampleFormat format, std::size_t count, SampleExtremes& extremes)
     {
         SampleExtremes rest;

@@ -1,11 +1,11 @@
-// Which vectors the fast roads over samples are written in. KT_VECTORS marks each function of theirs. For their .cpp
-// files only.
+// Chooses the vectors of the fast roads over samples. KT_VECTORS marks each of their functions. For their .cpp files
+// only.
 #pragma once
 
 #if defined(__x86_64__)
 
 #define KT_AVX2
-// Only the functions marked so are compiled for AVX2; the library runs everywhere.
+// Only the marked functions are compiled for AVX2; the library runs everywhere.
 #define KT_VECTORS __attribute__((target("avx2")))
 
 #elif defined(__aarch64__) && !defined(__AARCH64EB__)

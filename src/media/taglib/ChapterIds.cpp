@@ -7,7 +7,7 @@ namespace platform::taglib {
 
 namespace {
 
-/// Both are of one length. Looks before it writes, since a ByteVector that is written to is copied.
+/// Both ids have one length. Searches before it writes, because writing to a ByteVector copies it.
 template <class Characters>
 void replaceAll(Characters& characters, std::size_t size, std::string_view from, std::string_view to)
 {

@@ -29,7 +29,7 @@ std::string bytesAsText(const TagLib::ByteVector& bytes)
     return {bytes.data(), bytes.size()};
 }
 
-/// `id` and what tells it from others of its kind.
+/// `id` and the details that distinguish it from others of its kind.
 std::string keyOf(const ID3v2::Frame& frame, std::initializer_list<std::string> details)
 {
     std::string key = bytesAsText(frame.frameID());
@@ -44,7 +44,7 @@ bool isHidden(const ID3v2::Frame& frame)
     return id == kChapter.hidden || id == kContents.hidden;
 }
 
-/// A text, with the name that TagLib has for it.
+/// A text under the name that TagLib gives it.
 template <typename Frame>
 EmbeddedTag namedEntry(const Frame& frame, std::initializer_list<std::string> details, const TagLib::StringList& values)
 {
@@ -60,7 +60,7 @@ EmbeddedTag namedEntry(const Frame& frame, std::initializer_list<std::string> de
 template <typename Frame>
 EmbeddedTag languageEntry(const Frame& frame)
 {
-    // Kept: a language may be three NUL bytes, which is none.
+    // Kept: a language of three NUL bytes means none.
     const TagLib::ByteVector language = frame.language();
     const std::string code = language.isEmpty() || language[0] == '\0' ? std::string() : bytesAsText(language);
     return namedEntry(frame, {code, utf8(frame.description())}, frame.text());
@@ -75,7 +75,7 @@ EmbeddedTag pictureEntry(const ID3v2::AttachedPictureFrame& frame)
     return entry;
 }
 
-/// The texts of the frames inside a chapter, which `bytes` hold one behind another.
+/// Adds the texts of the frames inside a chapter, which `bytes` hold one after another.
 void addInnerTexts(const TagLib::ByteVector& bytes, const ID3v2::Header& header, TagLib::StringList& values)
 {
     for (unsigned int at = 0; at < bytes.size();) {
@@ -88,9 +88,8 @@ void addInnerTexts(const TagLib::ByteVector& bytes, const ID3v2::Header& header,
     }
 }
 
-/// A chapter ("ID3v2 Chapter Frame Addendum" 1.0): an id that ends with a NUL byte, the times of its start and end in
-/// milliseconds, offsets in bytes, and frames that say what it is. Of a table of contents, an id and the ids of what is
-/// in it.
+/// A chapter ("ID3v2 Chapter Frame Addendum" 1.0): an id that ends with a NUL byte, start and end in milliseconds, byte
+/// offsets, and frames that describe it. For a table of contents: an id and the ids of its entries.
 EmbeddedTag chapterEntry(const ID3v2::UnknownFrame& frame, const ID3v2::Header& header)
 {
     const TagLib::ByteVector data = frame.data();
@@ -126,7 +125,7 @@ EmbeddedTag entryOf(const ID3v2::Frame& frame, const ID3v2::Header& header)
     if (const auto* user = dynamic_cast<const ID3v2::UserTextIdentificationFrame*>(&frame)) {
         TagLib::StringList values = user->fieldList();
         if (!values.isEmpty())
-            values.erase(values.begin()); // the description
+            values.erase(values.begin()); // removes the description
         return namedEntry(*user, {utf8(user->description())}, values);
     }
     if (const auto* text = dynamic_cast<const ID3v2::TextIdentificationFrame*>(&frame))

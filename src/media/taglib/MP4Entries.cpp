@@ -13,7 +13,7 @@ using TagLib::String;
 
 constexpr const char* kSystem = "MP4";
 
-// What the items of the known names hold; TagLib keeps it to itself.
+// Kinds of value of the known names, which TagLib does not publish.
 constexpr std::array<std::string_view, 2> kPairs = {"trkn", "disk"};
 constexpr std::array<std::string_view, 5> kSwitches = {"cpil", "pgap", "pcst", "hdvd", "shwm"};
 constexpr std::array<std::string_view, 13> kNumbers = {"tmpo", "stik",        "rtng",       "akID", "tvsn",

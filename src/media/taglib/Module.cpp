@@ -1,4 +1,4 @@
-// What the library finds in the module when it loads it.
+// The module's entry point.
 #include "media/taglib/ChapterIds.h"
 #include "media/taglib/SourceStream.h"
 #include "media/taglib/TagEntries.h"
@@ -30,7 +30,7 @@ using namespace platform;
 using platform::taglib::Entries;
 using platform::taglib::SourceStream;
 
-/// Where the tags of a DSF file begin, by its header (DSF 1.01); 0 for none.
+/// Position of the tags in a DSF file, from its header (DSF 1.01); 0 if there are none.
 std::uint64_t tagsOfDSF(BytesView start)
 {
     constexpr std::size_t kHeaderSize = 28, kPointer = 20;
@@ -59,7 +59,7 @@ void addFLAC(TagLib::FLAC::File& file, Entries& entries)
         taglib::addID3v1(*file.ID3v1Tag(), entries);
 }
 
-/// Of APE, Musepack and WavPack.
+/// For APE, Musepack and WavPack.
 template <typename File>
 void addAPEFile(File& file, Entries& entries)
 {
@@ -77,7 +77,7 @@ void addTrueAudio(TagLib::TrueAudio::File& file, Entries& entries)
         taglib::addID3v1(*file.ID3v1Tag(), entries);
 }
 
-/// Of the kinds of Ogg.
+/// For the kinds of Ogg.
 template <typename File>
 void addComment(File& file, Entries& entries)
 {
@@ -97,7 +97,7 @@ void addASFFile(TagLib::ASF::File& file, Entries& entries)
         taglib::addASF(*file.tag(), entries);
 }
 
-/// Whether the stream is a file of this class; adds its entries if so.
+/// Whether the stream is a file of this class; if so, adds its entries.
 template <typename File>
 bool addedAs(void (*add)(File&, Entries&), SourceStream& stream, Entries& entries)
 {
@@ -110,7 +110,7 @@ bool addedAs(void (*add)(File&, Entries&), SourceStream& stream, Entries& entrie
     return true;
 }
 
-/// As above, of those whose tags may be ID3v2.
+/// As above, for classes whose tags may be ID3v2.
 template <typename File>
 bool addedWithFrames(void (*add)(File&, Entries&), SourceStream& stream, Entries& entries)
 {
@@ -123,7 +123,7 @@ bool addedWithFrames(void (*add)(File&, Entries&), SourceStream& stream, Entries
     return true;
 }
 
-/// Whether a file that begins so may be MPEG audio that TagLib does not know by its frames: AAC, or a tag alone.
+/// Whether the file may be MPEG audio whose frames TagLib does not recognize: AAC, or a tag alone.
 bool mayBeTaggedMPEG(BytesView start)
 {
     const bool isSync =
@@ -131,7 +131,7 @@ bool mayBeTaggedMPEG(BytesView start)
     return isSync || textOf(start).starts_with("ID3");
 }
 
-/// Containers that the library reads itself; TagLib knows some of them too.
+/// Containers that the library reads itself, some of which TagLib knows too.
 bool isOwnContainer(BytesView start)
 {
     constexpr std::array<std::string_view, 6> ids = {"RIFF", "RIFX", "RF64", "BW64", "FORM", "caff"};
@@ -161,7 +161,7 @@ std::int32_t readThrowing(const ByteSource& bytes, std::uint64_t length, Entries
 
     SourceStream stream(bytes, skipped, static_cast<long>(length - skipped));
     const bool isTagAlone = skipped > 0;
-    // The order matters: MPEG audio is recognised by little, but nothing else is taken for it.
+    // The order matters: little identifies MPEG audio, but nothing else is mistaken for it.
     const bool isKnown =
         !isTagAlone &&
         (addedWithFrames(addMPEG, stream, entries) || addedAs(addComment<TagLib::Ogg::Vorbis::File>, stream, entries) ||
@@ -184,7 +184,7 @@ std::int32_t readThrowing(const ByteSource& bytes, std::uint64_t length, Entries
     return stream.status();
 }
 
-/// Nothing is thrown across the module's border.
+/// Keeps exceptions from crossing the module's border.
 std::int32_t read(const ByteSource& bytes, std::uint64_t length, std::vector<EmbeddedTag>& tags)
 {
     try {

@@ -11,7 +11,7 @@ namespace platform::taglib {
 
 TagLib::ByteVector SourceStream::readBlock(unsigned long length)
 {
-    // A size that a file states never makes room: no more than there is of it.
+    // Allocates no more than the file still holds, whatever size it states.
     const auto left = static_cast<unsigned long>(std::max(length_ - position_, 0L));
     TagLib::ByteVector block(static_cast<unsigned int>(std::min({length, left, kMaxBlock})), '\0');
     std::size_t got = 0;
@@ -36,7 +36,7 @@ void SourceStream::followBoxes(const TagLib::ByteVector& header, long at)
         return;
     while (!boxEnds_.empty() && boxEnds_.back() <= at)
         boxEnds_.pop_back();
-    // 0 is up to the end of the file; 1 stands for a size of 64 bits, which may be as far.
+    // 0 means up to the end of the file; 1 announces a 64-bit size, which may be as large.
     const unsigned int size = header.toUInt();
     boxEnds_.push_back(size <= 1 ? length_ : at + static_cast<long>(size));
     if (boxEnds_.size() > kDeepestBox)
@@ -46,7 +46,7 @@ void SourceStream::followBoxes(const TagLib::ByteVector& header, long at)
 void SourceStream::seek(long offset, Position from)
 {
     const long base = from == Beginning ? 0 : from == Current ? position_ : length_;
-    // Offsets come from the file: a sum that leaves it stands at its ends.
+    // Offsets come from the file: a position outside it becomes its start or end.
     if (__builtin_add_overflow(base, offset, &position_))
         position_ = offset < 0 ? 0 : length_;
     position_ = std::max(position_, 0L);

@@ -9,8 +9,8 @@
 
 namespace platform::taglib {
 
-/// The bytes of `source` from `start` on, `length` of them, with ids of chapters hidden (ChapterIds.h); `source` must
-/// outlive it. What would write does nothing.
+/// `length` bytes of `source` from `start` on, with chapter ids hidden (ChapterIds.h). `source` must outlive it.
+/// Writing operations do nothing.
 class SourceStream final : public TagLib::IOStream {
 public:
     SourceStream(const ByteSource& source, std::uint64_t start, long length)
@@ -20,7 +20,7 @@ public:
     {
     }
 
-    /// 0, or the status of the first read that failed; what was read since is not to be believed.
+    /// 0, or the status of the first failed read, after which nothing that was read is reliable.
     std::int32_t status() const { return status_; }
 
     TagLib::FileName name() const override { return ""; }
@@ -40,7 +40,8 @@ private:
     static constexpr unsigned long kBoxHeader = 8;
     static constexpr std::size_t kDeepestBox = 64;
 
-    /// TagLib goes down the boxes of an MP4 file by recursion however deep they are nested: ends reading in time.
+    /// Ends reading before boxes of an MP4 file nest too deeply, since TagLib follows them by recursion without a
+    /// limit.
     void followBoxes(const TagLib::ByteVector& header, long at);
 
     const ByteSource& source_;
@@ -48,7 +49,7 @@ private:
     long length_;
     long position_ = 0;
     std::int32_t status_ = 0;
-    std::vector<long> boxEnds_; // of MP4 containers that the last header read lies in
+    std::vector<long> boxEnds_; // ends of the MP4 boxes around the last header read
 };
 
 } // namespace platform::taglib

@@ -1,4 +1,4 @@
-// The entries of each system of tags, as TagLib holds it.
+// The entries of each tagging system, as TagLib presents them.
 #pragma once
 
 #include "media/tags/EmbeddedTags.h"
@@ -26,21 +26,21 @@ void addAPE(TagLib::APE::Tag& tag, Entries& entries);
 void addMP4(TagLib::MP4::Tag& tag, Entries& entries);
 void addASF(TagLib::ASF::Tag& tag, Entries& entries);
 
-// What they have in common.
+// Shared by all systems.
 
 inline std::string utf8(const TagLib::String& text)
 {
     return text.to8Bit(true);
 }
 
-/// `text`, which was read as Latin-1, by what people write there: UTF-8 where its bytes are.
+/// Corrects `text`, which was read as Latin-1, by common use: bytes that are UTF-8 are read as UTF-8.
 TagLib::String byUse(const TagLib::String& text);
 EmbeddedTag textEntry(const char* system, std::string key, const TagLib::StringList& values);
-/// `bytes` that are no text.
+/// An entry for `bytes` that are not text.
 EmbeddedTag dataEntry(const char* system, std::string key, const TagLib::ByteVector& bytes);
-/// The name that programs know it by, where `properties`, TagLib's view of one entry, has just one.
+/// The common name of an entry, if `properties`, TagLib's view of it, has exactly one.
 std::string commonName(const TagLib::PropertyMap& properties);
-/// "Front Cover" and the like, by the number that ID3v2 and FLAC share.
+/// "Front Cover" and so on, by the number that ID3v2 and FLAC share.
 std::string pictureKind(int number);
 
 } // namespace platform::taglib

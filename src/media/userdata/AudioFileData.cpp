@@ -1,4 +1,4 @@
-// The samples of an open audio file: reading and writing by packet and by byte.
+// The samples of an open audio file, read and written by packet and by byte.
 #include "media/containers/ContainerSizes.h"
 #include "media/userdata/AudioFileImplementation.h"
 #include "platform/core/Packed.h"
@@ -16,7 +16,7 @@ std::int32_t AudioFile::Implementation::describe()
     if (status != kStatusOK || description)
         return status;
     AudioDescription found;
-    if (isWritable) { // what the scan read may have been written over
+    if (isWritable) { // a write may have changed what the scan read
         HeaderWindow now(bytes, layout.fileLength);
         status = describeAudio(now, layout, found);
     } else {
@@ -27,7 +27,7 @@ std::int32_t AudioFile::Implementation::describe()
     return status;
 }
 
-/// Makes the sizes of the container say what was written: the chunk, then the frame count of AIFF, then the container.
+/// Updates the sizes after a write: the chunk's, then AIFF's frame count, then the container's.
 std::int32_t AudioFile::Implementation::extendAudio(std::uint64_t byteCount, std::uint64_t chunkSize)
 {
     Chunk& data = layout.chunks.back();
@@ -70,7 +70,7 @@ std::int32_t AudioFile::Implementation::writeAudio(std::uint64_t firstByte, Byte
     const std::uint64_t dataEnd = description->dataOffset + end;
     if (const std::int32_t status = checkContainerEnd(layout, dataEnd + 1); status != kStatusOK)
         return status;
-    // The samples first, behind an end that nobody looks past; an open-ended CAF file shows them at once.
+    // The samples come first, behind an end that no reader passes; in an open-ended CAF file they count at once.
     const std::uint64_t formerLength = layout.fileLength;
     const std::uint64_t size = std::max(last.size, dataEnd - layout.bodyOf(last));
     const std::byte pad{0};

@@ -1,4 +1,4 @@
-// What an open AudioFile holds.
+// The state of an open AudioFile.
 #pragma once
 
 #include "media/containers/AudioDescription.h"
@@ -13,8 +13,8 @@
 
 namespace platform {
 
-/// Owns the descriptor. Of a file that is open for writing it keeps what it read of the container until an edit, or a
-/// change of the file's length, makes it read again; of one that is only read, as long as it is open.
+/// Owns the descriptor. Keeps what was read of the container: if the file is open for writing, until an edit or a
+/// change of the file's length; otherwise while it is open.
 struct AudioFile::Implementation {
     Implementation(int descriptor, Permission access) : bytes(descriptor), isWritable(access == Permission::readWrite)
     {
@@ -22,9 +22,9 @@ struct AudioFile::Implementation {
 
     std::int32_t scan();
     std::int32_t scan(std::uint64_t fileLength);
-    /// Scans again when the file is not what was scanned.
+    /// Scans again if the file has changed since the last scan.
     std::int32_t refresh();
-    /// Places, in the layout's list, of the chunks of a type; enumerating them by index stays linear.
+    /// Indices, in the layout's list, of the chunks of a type; keeps enumeration by index linear.
     const std::vector<std::uint32_t>& itemsOf(FourCC type);
     std::int32_t readBody(const Chunk& chunk, void* to, std::size_t count) const;
     std::int32_t findItem(FourCC type, std::uint32_t index, const Chunk*& chunk);

@@ -1,5 +1,5 @@
-// The CAF information dictionary. "info": the number of pairs (u32), then for each pair key and value, each ended by
-// NUL.
+// The CAF information dictionary "info": the number of pairs (u32), then for each pair the key and the value, both
+// ended by NUL.
 #include "media/userdata/AudioFileImplementation.h"
 #include "platform/core/ByteReader.h"
 #include "platform/core/ByteWriter.h"
@@ -13,7 +13,7 @@ namespace {
 
 constexpr FourCC kInfo = fourCC("info");
 
-/// The text up to the next NUL; nullopt when there is none.
+/// The text up to the next NUL; none if there is no NUL.
 std::optional<std::string> readText(ByteReader& reader)
 {
     const std::string_view rest = textOf(reader.rest());
@@ -24,7 +24,7 @@ std::optional<std::string> readText(ByteReader& reader)
     return std::string(rest.substr(0, length));
 }
 
-/// The pairs that are whole, as many as the count says at most; of two with one key the first.
+/// The complete pairs, at most as many as the count says; of two pairs with one key, the first.
 Dictionary parseInformation(BytesView body)
 {
     Dictionary texts;
@@ -79,7 +79,7 @@ std::int32_t AudioFile::setInformation(const Dictionary& information)
         return kStatusFileTooBig;
     if (!information.empty())
         return implementation_->setItem(kInfo, 0, writer.view());
-    // A further "info", which nobody reads, would become the first: the last one goes first.
+    // Removes the last "info" first: a further one, which nobody reads, would otherwise become the first.
     std::uint32_t count = 0;
     std::int32_t status = countUserData(kInfo, count);
     for (; status == kStatusOK && count > 0; --count)

@@ -1,4 +1,4 @@
-// What an open audio file tells by four-character id.
+// Properties of an open audio file by four-character id.
 #include "media/userdata/AudioFileService.h"
 #include "platform/core/Status.h"
 

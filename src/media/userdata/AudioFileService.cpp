@@ -58,7 +58,7 @@ std::unique_ptr<AudioFile> AudioFile::openAny(const URL& url, Permission permiss
     }
     FileStatus found;
     const OpenFor access = permission == Permission::read ? OpenFor::reading : OpenFor::readingAndWriting;
-    // Few paths lead through links; one that does not is opened for reading with a call less.
+    // Few paths contain links; one that does not is opened for reading with one call less.
     int descriptor =
         permission == Permission::read ? systemCalls().openFileWithoutLinks(path.c_str(), access, &found) : -1;
     if (descriptor < 0)
@@ -80,7 +80,7 @@ std::unique_ptr<AudioFile> AudioFile::create(const URL& url, FourCC fileType, co
     std::int32_t ignored;
     std::int32_t& result = status != nullptr ? *status : ignored;
     const std::string& path = url.posixPath();
-    // Samples begin on a page, and filler ahead of them is for user data to come.
+    // Samples begin on a page; the filler before them is room for user data.
     const Bytes content = headerOf({.fileType = fileType,
                                     .format = format,
                                     .speakers = std::nullopt,
@@ -110,7 +110,7 @@ std::unique_ptr<AudioFile> AudioFile::create(const URL& url, FourCC fileType, co
     if (result == kStatusOK)
         file = open(url, Permission::readWrite, fileType, &result);
     if (!file && !isThere)
-        std::remove(path.c_str()); // ours: it was created just now, or creating it had failed
+        std::remove(path.c_str()); // ours: it was created just now, or creating it failed
     return file;
 }
 
@@ -161,7 +161,7 @@ const std::vector<std::uint32_t>& AudioFile::Implementation::itemsOf(FourCC type
     return items;
 }
 
-/// What the scan read on its way need not be read again.
+/// Reuses what the scan has read.
 std::int32_t AudioFile::Implementation::readBody(const Chunk& chunk, void* to, std::size_t count) const
 {
     const std::uint64_t position = layout.bodyOf(chunk);
@@ -228,7 +228,7 @@ std::int32_t AudioFile::Implementation::removeItems(FourCC type, std::span<const
 std::int32_t AudioFile::countUserData(FourCC type, std::uint32_t& count)
 {
     count = 0;
-    // What may be edited is read anew: others may have changed it, and whoever enumerates begins here.
+    // Chunks that may be edited are scanned anew: others may have changed them, and enumeration begins here.
     const std::int32_t status = implementation_->isWritable ? implementation_->scan() : implementation_->refresh();
     if (status != kStatusOK)
         return status;

@@ -1,11 +1,11 @@
-// Writes chunks one behind the other, gathered into few calls.
+// Writes chunks one after another, gathered into few calls.
 #pragma once
 
 #include "media/containers/ContainerLayout.h"
 
 namespace platform {
 
-/// Writes from one position of the file on. The first failure is kept, and nothing is written after it.
+/// Writes from one position on. Keeps the first failure, after which nothing is written.
 class ChunkEmitter {
 public:
     ChunkEmitter(const FileBytes& file, const ContainerLayout& layout, std::uint64_t position)
@@ -17,12 +17,12 @@ public:
 
     void header(FourCC id, std::uint64_t size);
     void bytes(BytesView bytes);
-    /// A body that stands elsewhere in the file, ahead of or behind what is written, never under it.
+    /// Copies a body from elsewhere in the file, before or after what is written, never overlapping it.
     void copy(std::uint64_t from, std::uint64_t size);
     void pad(std::uint64_t size);
-    /// Where the next byte goes.
+    /// Position of the next byte.
     std::uint64_t position() const { return position_ + gathered_.size(); }
-    /// Writes what is gathered; the status of it all.
+    /// Writes what is gathered; returns the status of all writes.
     std::int32_t flush();
 
 private:

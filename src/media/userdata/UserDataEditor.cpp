@@ -11,7 +11,8 @@
 namespace platform {
 
 namespace {
-/// How much of other chunks an edit copies to keep their order; beyond it the edit takes the road without copies.
+/// How many bytes of other chunks an edit copies to keep their order; beyond that it replaces in two steps, without
+/// copies.
 constexpr std::uint64_t kLargestCopy = 16 * 1024 * 1024;
 } // namespace
 
@@ -53,7 +54,7 @@ std::int32_t UserDataEditor::remove(const std::vector<std::size_t>& chunks)
 
 // What chunks are to an edit.
 
-/// The first chunk stays what it is: in WAVE it may be the place of a "ds64", in CAF it is the description.
+/// Never the first chunk: in WAVE it may be the place of a "ds64", in CAF it is the description.
 bool UserDataEditor::isFiller(std::size_t chunk) const
 {
     return chunk > 0 && layout_.chunks[chunk].id == ContainerLayout::filler;
@@ -86,8 +87,9 @@ UserDataEditor::Piece UserDataEditor::pieceOf(std::size_t chunk) const
     return {asked.id, asked.size, {}, layout_.bodyOf(asked)};
 }
 
-/// Whether one filler between two places would end where it should: readers take a zero behind an odd size for the pad
-/// byte. Sizes are odd where chunks lack theirs, and only there can an id that begins with zero follow.
+/// Whether a single filler between two positions would end where it should: readers take a zero after an odd size for
+/// the pad byte. Odd sizes occur where chunks lack their pad byte, and only then can an id that begins with zero
+/// follow.
 bool UserDataEditor::canBeFiller(std::uint64_t position, std::uint64_t end, std::optional<FourCC> nextId) const
 {
     if (layout_.padOf(end - position) == 0)
@@ -106,7 +108,7 @@ std::uint64_t UserDataEditor::extentOf(const Content& content) const
         [this](std::uint64_t sum, const Piece& piece) { return sum + layout_.extentOf(piece.size); });
 }
 
-/// The chunks from one on, without filler; nullopt when they may not be copied.
+/// The chunks from one on, without filler; none if they may not be copied.
 std::optional<UserDataEditor::Content> UserDataEditor::everythingFrom(std::size_t chunk) const
 {
     Content content;
@@ -124,8 +126,8 @@ std::optional<UserDataEditor::Content> UserDataEditor::everythingFrom(std::size_
 
 // Where new bytes find room.
 
-/// Into filler that stands ahead of a chunk, together with the chunks between them; the rest, through the chunk that
-/// becomes hidden, becomes filler.
+/// Writes into filler before a chunk, together with the chunks between. The rest, up to and including the chunk to
+/// hide, becomes filler.
 std::optional<std::int32_t> UserDataEditor::placeInFrontOf(std::size_t hidden, const Content& content)
 {
     const std::uint64_t hiddenEnd = hidden < layout_.chunks.size() ? runAround(hidden).end : layout_.end;
@@ -147,7 +149,7 @@ std::optional<std::int32_t> UserDataEditor::placeInFrontOf(std::size_t hidden, c
     return std::nullopt;
 }
 
-/// Into filler that stands behind a chunk, together with the chunks between them; all ahead of it becomes filler.
+/// Writes into filler after a chunk, together with the chunks between. Everything before the content becomes filler.
 std::optional<std::int32_t> UserDataEditor::placeBehind(std::size_t hidden, const Piece& piece)
 {
     const std::uint64_t hiddenFrom = runAround(hidden).position;
@@ -169,7 +171,7 @@ std::optional<std::int32_t> UserDataEditor::placeBehind(std::size_t hidden, cons
     return std::nullopt;
 }
 
-/// Into filler between two places of the list, where nothing is hidden for it.
+/// Writes into filler between two places of the list, without hiding anything.
 std::optional<std::int32_t> UserDataEditor::placeBetween(std::size_t first, std::size_t past, const Content& content)
 {
     for (std::size_t i = first; i < past; ++i) {
@@ -183,7 +185,7 @@ std::optional<std::int32_t> UserDataEditor::placeBetween(std::size_t first, std:
     return std::nullopt;
 }
 
-/// Behind the last chunk; everything from a chunk on is hidden, and comes back in the content.
+/// Writes after the last chunk. Everything from `hiddenFrom` on is hidden, and repeated in the content.
 std::optional<std::int32_t> UserDataEditor::placeAtEnd(std::size_t hiddenFrom, const Content& content)
 {
     const std::uint64_t position = runAround(hiddenFrom).position;
@@ -196,10 +198,20 @@ std::optional<std::int32_t> UserDataEditor::placeAtEnd(std::size_t hiddenFrom, c
     return fillBehind(position, run(last, last + 1), content);
 }
 
-// How it is written.
+// How content is written.
 
-/// Writes the content over the front of filler. The header of its first chunk comes last: until then the filler hides
-/// everything, afterwards new filler behind the content hides the rest, up to `hiddenEnd`.
+/// Writes the content over the front of a run of filler. What readers see after each step:
+///
+/// 1. mergeFiller: one header makes the run a single filler. The chunks are the same.
+/// 2. The body of the first chunk, the further chunks and the header of the filler that will follow them are written
+/// inside that filler, where nobody looks: it still has its own header.
+/// 3. A flush, so that the next write cannot reach the disk ahead of these.
+/// 4. One header, 8 bytes (CAF: 12), turns the filler into the first chunk. From here on readers walk from it to the
+/// next one and on to the new filler, which ends at `hiddenEnd` and so hides the chunks up to there.
+///
+/// A process that dies before 4 leaves the old chunks and filler, which the next edit overwrites; after 4 it leaves the
+/// new ones. finish() only cuts filler off at the end. A header that is written in part is put back by
+/// FileBytes::overwrite.
 std::optional<std::int32_t> UserDataEditor::fillFront(const Run& filler, std::uint64_t hiddenEnd,
                                                       const Content& content)
 {
@@ -211,7 +223,7 @@ std::optional<std::int32_t> UserDataEditor::fillFront(const Run& filler, std::ui
     const std::uint64_t restSize = exact ? 0 : hiddenEnd - filler.position - extent - layout_.headerSize();
     if (restSize > layout_.largestChunk() || room > layout_.largestChunk())
         return std::nullopt;
-    // Nor may the pad byte that the chunk ahead lacks appear.
+    // The chunk before the run lacks its pad byte, so the first byte of the new id must not look like one.
     if (filler.first > 0 && layout_.chunks[filler.first - 1].padMissing && content.front().id >> 24 == 0)
         return std::nullopt;
     if (!canBeFiller(filler.position, filler.end) || (!exact && !canBeFiller(filler.position + extent, hiddenEnd)))
@@ -235,7 +247,9 @@ std::optional<std::int32_t> UserDataEditor::fillFront(const Run& filler, std::ui
     return writeHeader(filler.position, content.front().id, content.front().size);
 }
 
-/// Writes the content inside filler; then one header makes filler of all between `hiddenFrom` and the content.
+/// Writes the content inside a run of filler, after the filler's header, with a header for each chunk and for the
+/// filler that remains; flushes; then one header at `hiddenFrom` makes everything up to the content filler. Before that
+/// last write readers find the old chunks, after it the new ones, as in fillFront.
 std::optional<std::int32_t> UserDataEditor::fillBehind(std::uint64_t hiddenFrom, const Run& filler,
                                                        const Content& content)
 {
@@ -266,9 +280,17 @@ std::optional<std::int32_t> UserDataEditor::fillBehind(std::uint64_t hiddenFrom,
     return writeHeader(hiddenFrom, ContainerLayout::filler, start - hiddenFrom - layout_.headerSize());
 }
 
-/// For a chunk that the samples hold apart from all room: the new one first, then the old one becomes filler. Between
-/// the two both are there, the old one first. Others of its type for which there is no room behind the new one either
-/// are copied along, so that every item keeps its index.
+/// Replaces a chunk that the samples separate from all room. Content is written by the ways above, so each step is
+/// whole or absent:
+///
+/// 1. The new chunk is added as near behind the old one as there is room. Between the two steps both are there, the old
+/// one first: readers that take the first of a type see the old one. If other chunks of the type stand between, copies
+/// of them are added behind the new one, so that no index changes in the end.
+/// 2. hideOld makes filler of the old ones, the last one first.
+///
+/// A process that dies after 1 leaves the old chunk under its index, and the new one as one more of its type, behind
+/// it; chunks of the type that follow count on by as many as were added. Nothing removes that: the next edit by index
+/// changes the old chunk, or whoever lists the chunks removes one of the two.
 std::int32_t UserDataEditor::replaceByTwoSteps(std::size_t chunk, const Piece& piece)
 {
     Content content{piece};
@@ -292,13 +314,14 @@ std::int32_t UserDataEditor::replaceByTwoSteps(std::size_t chunk, const Piece& p
     if (*status != kStatusOK)
         return *status;
 
-    // The old ones stand ahead of all that changed, so that their places in the list are the same.
+    // The old chunks stand before everything that changed, so their indices in the list are the same.
     if (const std::int32_t scanned = rescan(); scanned != kStatusOK)
         return scanned;
     return hideOld(old, piece.id);
 }
 
-/// The last one first: until the end the first one is the first. What cannot be finished is undone.
+/// Hides the last chunk first, so that the first one stays the first until the end. If one cannot be hidden, the edit
+/// is undone.
 std::int32_t UserDataEditor::hideOld(const std::vector<std::size_t>& old, FourCC id)
 {
     std::size_t left = old.size();
@@ -309,7 +332,7 @@ std::int32_t UserDataEditor::hideOld(const std::vector<std::size_t>& old, FourCC
         if (const std::int32_t scanned = rescan(); scanned != kStatusOK)
             return scanned;
     }
-    // Of the new ones those go whose old ones are still there.
+    // Removes the new chunks whose old ones are still there.
     const std::size_t last = left > 0 ? old[left - 1] : 0;
     for (std::size_t next; left > 0; --left)
         if (next = nextOfType(last + 1, id);
@@ -325,7 +348,7 @@ std::size_t UserDataEditor::nextOfType(std::size_t from, FourCC id) const
     return from;
 }
 
-/// Chunks of one type.
+/// Appends chunks of one type behind all others of that type.
 std::int32_t UserDataEditor::appendContent(const Content& content)
 {
     if (const std::int32_t status = trimEnd(); status != kStatusOK)
@@ -336,7 +359,7 @@ std::int32_t UserDataEditor::appendContent(const Content& content)
         --behindItsType;
     if (const auto status = placeBetween(behindItsType, count, content))
         return *status;
-    // Moving the last chunks into filler ahead of them keeps a file from growing with every edit.
+    // Moving the last chunks into filler before them keeps the file from growing with every edit.
     if (!layout_.isBroken)
         if (const auto status = placeInFrontOf(count, content))
             return *status;
@@ -346,13 +369,13 @@ std::int32_t UserDataEditor::appendContent(const Content& content)
     return *fillFront(filler, filler.end, content);
 }
 
-/// Makes filler of a chunk, and one filler of it and its neighbours.
+/// Makes filler of a chunk, merged with its neighbours.
 std::int32_t UserDataEditor::hide(std::size_t chunk)
 {
     return hideAll({chunk});
 }
 
-/// Chunks that stand in a row, with nothing but filler between them, become one filler by a single header.
+/// Hides chunks that only filler separates with a single header.
 std::int32_t UserDataEditor::hideAll(const std::vector<std::size_t>& chunks)
 {
     std::int32_t status = kStatusOK;
@@ -380,16 +403,19 @@ std::int32_t UserDataEditor::hideRun(const Run& hidden)
                                           : kStatusFileTooBig;
 }
 
-/// Puts filler of this extent, header included, behind the last chunk.
+/// Adds filler of this size, header included, after the last chunk. In RIFF and AIFF nobody sees it until the
+/// container's size, which is written last, counts it. In CAF the header counts at once, and for an instant the filler
+/// runs past the end of the file. A process that dies in between leaves the same chunks and, at most, filler that is
+/// cut short, which the next edit cuts off.
 std::int32_t UserDataEditor::grow(std::uint64_t extent)
 {
     if (layout_.isBroken || extent > layout_.largestChunk())
         return layout_.isBroken ? kStatusIOError : kStatusFileTooBig;
     if (layout_.chunks.empty() && layout_.kind() == ContainerKind::caf)
-        return kStatusIOError; // the description must be the first chunk
+        return kStatusIOError; // the description must come first
     if (const std::int32_t status = checkContainerEnd(layout_, layout_.end + 1 + extent); status != kStatusOK)
         return status;
-    // The bytes behind the container are nobody's, unless they are samples whose size was never filled in.
+    // Bytes after the container belong to nobody, unless they are samples whose size was never filled in.
     if (!layout_.chunks.empty() && layout_.chunks.back().id == layout_.audioDataId() &&
         layout_.chunks.back().size == 0 && hasForeignTail(file_, layout_))
         return kStatusIOError;
@@ -398,7 +424,7 @@ std::int32_t UserDataEditor::grow(std::uint64_t extent)
 
     const Chunk filler{.position = layout_.end, .size = extent - layout_.headerSize(), .id = ContainerLayout::filler};
     const std::uint64_t formerLength = layout_.fileLength;
-    // In CAF the header is in force at once, and the file catches up with it; elsewhere nobody looks there yet.
+    // CAF readers see the header at once, and the file's length follows; other readers do not look there yet.
     std::int32_t status = file_.write(filler.position, layout_.header(filler.id, filler.size).data(),
                                       static_cast<std::size_t>(layout_.headerSize()));
     if (status == kStatusOK)
@@ -427,7 +453,7 @@ std::int32_t UserDataEditor::writeHeader(std::uint64_t position, FourCC id, std:
     return file_.overwrite(position, BytesView(header).first(static_cast<std::size_t>(layout_.headerSize())));
 }
 
-/// The edit is done, or undone, before this: what is left is filler at the end, and a failure to cut it off harms
+/// Called when the edit is done or undone. What is left to do is to cut filler off the end; failing to do so harms
 /// nobody.
 std::int32_t UserDataEditor::finish(std::int32_t status)
 {
@@ -436,14 +462,15 @@ std::int32_t UserDataEditor::finish(std::int32_t status)
     return status;
 }
 
-/// Cuts filler off the end of the container. That it cannot be cut is no failure, that the file cannot be read is.
+/// Cuts filler off the end of the container: first its size, then the file's length, so that a process that dies in
+/// between leaves bytes that nobody counts. Failing to cut is no error, failing to read the file is.
 std::int32_t UserDataEditor::trimEnd()
 {
     std::size_t first = layout_.chunks.size();
     while (first > 0 && isFiller(first - 1))
         --first;
     if (first == layout_.chunks.size() || layout_.end < layout_.fileLength)
-        return kStatusOK; // nothing to cut, or bytes behind it that are not ours
+        return kStatusOK; // nothing to cut, or foreign bytes behind it
     const std::uint64_t end = layout_.chunks[first].position;
     if (file_.flush() == kStatusOK && writeContainerEnd(file_, layout_, end) == kStatusOK)
         file_.setLength(end);

@@ -1,4 +1,4 @@
-// Crash-safe edits of a container's user data: docs/formats/user-data-edits.md says how, container by container.
+// Crash-safe edits of a container's user data; docs/formats/user-data-edits.md describes them for each container.
 #pragma once
 
 #include "media/containers/ContainerLayout.h"
@@ -10,32 +10,31 @@
 
 namespace platform {
 
-/// Changes the chunks of one open file. At every instant, whichever call of the system is the last one that happens,
-/// the file opens, its samples are where they were, and each chunk is whole: the one before the edit or the one after
-/// it.
+/// Changes the chunks of one open file. Whichever system call is the last that happens, the file opens, its samples are
+/// where they were, and each chunk is whole: the one before the edit or the one after it.
 ///
-/// What makes that so: an edit prepares its bytes where no reader looks, inside a filler chunk or behind the end, and
-/// then shows them by rewriting a single chunk header. Operations return 0 or a negative status code; whatever they
-/// return, `layout` is read again from the file.
+/// An edit prepares its bytes where no reader looks, inside a filler chunk or behind the end, and then shows them by
+/// rewriting a single chunk header. Operations return 0 or a negative status code; whatever they return, `layout` has
+/// been read again from the file.
 class UserDataEditor {
 public:
-    /// Neither is owned. The layout is that of the file now.
+    /// Owns neither. The layout must be that of the file now.
     UserDataEditor(const FileBytes& file, ContainerLayout& layout) : file_(file), layout_(layout) {}
 
     /// Gives the chunk at a place of the layout's list another body.
     std::int32_t replace(std::size_t chunk, BytesView body);
-    /// Adds a chunk behind all those of its type.
+    /// Adds a chunk after all others of its type.
     std::int32_t append(FourCC id, BytesView body);
     /// Removes the chunks at these places, which ascend; the last ones go first.
     std::int32_t remove(const std::vector<std::size_t>& chunks);
 
 private:
-    /// A chunk to be written: a new one, or one of the file that changes its place.
+    /// A chunk to be written: a new one, or one of the file that moves.
     struct Piece {
         FourCC id = 0;
         std::uint64_t size = 0;
-        BytesView newBody;                            // of a new one
-        std::optional<std::uint64_t> bodyInFile = {}; // where the body of a moved one stands
+        BytesView newBody;                            // of a new chunk
+        std::optional<std::uint64_t> bodyInFile = {}; // where a moved chunk's body stands
     };
     using Content = std::vector<Piece>;
     struct Run { // neighbouring chunks: all filler, or the chunk asked for between filler
@@ -54,7 +53,7 @@ private:
     std::uint64_t extentOf(const Content& content) const;
     std::optional<Content> everythingFrom(std::size_t chunk) const;
 
-    // Each is nullopt when there is no room that way, and nothing was changed.
+    // None if there is no room that way; then nothing was changed.
     std::optional<std::int32_t> placeInFrontOf(std::size_t hidden, const Content& content);
     std::optional<std::int32_t> placeBehind(std::size_t hidden, const Piece& piece);
     std::optional<std::int32_t> placeBetween(std::size_t first, std::size_t past, const Content& content);

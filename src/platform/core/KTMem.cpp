@@ -34,7 +34,7 @@ KTMem::~KTMem()
 
 bool KTMem::allocate(std::size_t size)
 {
-    // calloc leaves untouched pages to the system, so that a large block costs nothing until it is used.
+    // calloc leaves untouched pages to the system, so a large block costs nothing until it is used.
     std::byte* fresh = nullptr;
     if (size > 0) {
         fresh = static_cast<std::byte*>(std::calloc(size, 1));
@@ -53,7 +53,7 @@ bool KTMem::reallocate(std::size_t size)
         free();
         return true;
     }
-    // Half again as much on growth; the exact size when that much is not to be had, and when shrinking by half.
+    // Grows by half; takes the exact size if that much cannot be had, and when shrinking by half.
     if (size > capacity_ || size < capacity_ / 2) {
         std::size_t capacity = size > size_ ? std::max(size, capacity_ + capacity_ / 2) : size;
         void* moved = std::realloc(data_, capacity);

@@ -103,7 +103,7 @@ std::int32_t NSErrorToOSErr(const platform::Error* error)
     if (error != nullptr && error->domain == platform::ErrorDomain::status)
         return static_cast<std::int32_t>(error->code);
     if (error != nullptr && error->domain == platform::ErrorDomain::system) {
-        // No system has numbers that wide: such a code is an unlisted one.
+        // Codes of the system are never wider than an int; a wider one counts as unlisted.
         const bool fits = error->code >= 0 && error->code <= std::numeric_limits<int>::max();
         return fits ? PosixErrorToOSErr(static_cast<int>(error->code)) : kStatusIOError;
     }

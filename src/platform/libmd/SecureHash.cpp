@@ -21,7 +21,8 @@ std::optional<SHA256Digest> fileSystemRepresentationSHA256(const String& path)
 {
     if (path.isNull() || path.utf8().find('\0') != std::string::npos)
         return std::nullopt;
-    return sha256(bytesOf(path.utf8())); // names are not decomposed here: the representation is the text as it is
+    // Names are not decomposed here: the text as it stands is the representation.
+    return sha256(bytesOf(path.utf8()));
 }
 
 } // namespace platform

@@ -9,13 +9,13 @@ namespace platform::libxml2 {
 
 namespace {
 
-// An XML declaration is looked for in so many bytes.
+// An XML declaration is searched for in the first bytes only.
 constexpr std::size_t kStart = 1024;
 
-/// The value of "encoding" in the XML declaration that `text` begins with; empty when there is none.
+/// The value of "encoding" in the XML declaration that `text` begins with; empty if there is none.
 std::string_view declaredEncoding(std::string_view text)
 {
-    if (!text.starts_with("<?xml") || text.find_first_of(" \t\r\n") != 5) // "<?xml-stylesheet" is something else
+    if (!text.starts_with("<?xml") || text.find_first_of(" \t\r\n") != 5) // not "<?xml-stylesheet"
         return {};
     text = text.substr(0, text.find("?>"));
     std::size_t at = text.find("encoding");
@@ -45,14 +45,14 @@ std::string_view XMLInput::next(std::size_t most)
     return text;
 }
 
-/// Leaves text in `waiting_`, or nothing when the piece had none, at the end, and after a failure.
+/// Leaves text in `waiting_`; none if the piece held none, at the end, and after a failure.
 void XMLInput::refill()
 {
     std::string_view piece;
     if (encoding_ == Encoding::unknown) {
         while (start_.size() < kStart && !atEnd_ && !failed_)
             start_ += readPiece();
-        if (!chooseEncoding()) // what came before a failure still counts
+        if (!chooseEncoding()) // the text before a failure still counts
             return;
         piece = start_;
     } else {
@@ -73,7 +73,7 @@ void XMLInput::refill()
         waiting_ = waiting_.substr(0, nul);
         failEncoding("a NUL character");
     }
-    // From any other start it would guess an encoding of its own.
+    // From any other first character the parser would guess an encoding.
     if (atStart_ && !waiting_.empty()) {
         atStart_ = false;
         if (std::string_view("< \t\r\n").find(waiting_.front()) == std::string_view::npos) {

@@ -1,5 +1,5 @@
-// The bytes of a stream on their way to libxml2: read in pieces, decoded to UTF-8. libxml2's own decoders are not used:
-// they report bad bytes to the process-wide error handlers.
+// Feeds the bytes of a stream to libxml2: reads in pieces, decodes to UTF-8. libxml2's own decoders are not used,
+// because they report bad bytes to the process-wide error handlers.
 #pragma once
 
 #include "platform/XMLParser.h"
@@ -15,7 +15,7 @@ public:
     explicit XMLInput(InputStream& stream) : stream_(stream) {}
     void setProgressHandler(XMLParser::ProgressHandler handler) { progress_ = std::move(handler); }
 
-    /// The next bytes in UTF-8, which the next call makes invalid; none at the end, and after a failure.
+    /// The next bytes in UTF-8, valid until the next call; empty at the end and after a failure.
     std::string_view next(std::size_t most);
 
     bool failed() const { return failed_; }
@@ -40,10 +40,10 @@ private:
     std::uint64_t bytesRead_ = 0;
     std::array<std::byte, 64 * 1024> piece_;
     std::string start_;        // the first bytes, until the encoding is known
-    std::string decoded_;      // of the piece, unless it is taken as it is
-    std::string_view waiting_; // UTF-8 not handed out yet
+    std::string decoded_;      // the decoded piece, unless it is taken as it is
+    std::string_view waiting_; // UTF-8 that was not handed out yet
     Encoding encoding_ = Encoding::unknown;
-    bool atStart_ = true; // nothing has been handed out
+    bool atStart_ = true; // nothing was handed out yet
     bool atEnd_ = false;
     bool failed_ = false;
     std::optional<char> oddByte_; // the first half of a UTF-16 unit

@@ -19,8 +19,7 @@ const xmlChar* xmlText(const std::string& text)
     return reinterpret_cast<const xmlChar*>(text.c_str());
 }
 
-/// Of an element or an attribute: the name as it is written, which the library keeps in two parts when it knows the
-/// namespace.
+/// The qualified name of an element or attribute. The library splits it in two if it knows the namespace.
 std::string nameOf(const xmlChar* name, const xmlNs* space)
 {
     std::string written;
@@ -29,7 +28,7 @@ std::string nameOf(const xmlChar* name, const xmlNs* space)
     return written += textViewOf(name);
 }
 
-/// The text below a node of the library; entities of the tree's own are replaced.
+/// The text below a library node; entities of the tree itself are replaced.
 std::string contentOf(const void* node)
 {
     const std::unique_ptr<xmlChar, void (*)(void*)> content(xmlNodeGetContent(static_cast<const xmlNode*>(node)),
@@ -75,7 +74,7 @@ std::string XMLNode::stringValue() const
     return contentOf(node_);
 }
 
-/// Makes the nodes out of the events, so that the tree keeps to the same limits.
+/// Builds the nodes from the parser's events, so that a tree has the same limits.
 class XMLTree::Builder : public XMLHandler {
 public:
     explicit Builder(xmlDocPtr document) : document_(document) {}
@@ -104,12 +103,12 @@ public:
     }
 
 private:
-    /// The pieces of a text are added at once: the library would look for the end of what is there each time.
+    /// Adds the pieces of a text at once; the library would search for its end at each piece.
     void addText()
     {
         if (text_.empty())
             return;
-        if (text_.size() > std::size_t{std::numeric_limits<int>::max()}) // it counts so far
+        if (text_.size() > std::size_t{std::numeric_limits<int>::max()}) // the library counts in int
             throw std::bad_alloc();
         xmlNodeAddContentLen(open_, xmlText(text_), static_cast<int>(text_.size()));
         text_.clear();

@@ -19,16 +19,16 @@ namespace platform {
 
 namespace {
 
-// The parser compares every attribute of a tag with every other, so that a longer tag is refused: time stays in
-// proportion to the bytes.
+// The parser compares every attribute of a tag with every other, so a longer tag is refused to keep time in proportion
+// to the bytes.
 constexpr std::size_t kLongestTag = 16 * 1024;
-// Reading stops where a tag would be longer in any case: what is read for one may begin ahead of it.
+// Reading stops where a tag is certainly too long; the bytes that are read for a tag may begin before it.
 constexpr std::size_t kLongestRead = 2 * kLongestTag;
-// It looks for a prefix among all the namespaces in force.
+// The parser searches all namespaces in force for a prefix.
 constexpr int kMostNamespaces = 256;
-// It keeps every name to the end, in a few thousand lists: a million different ones would take minutes.
+// The parser keeps every name until the end, in a few thousand lists; a million different names would take minutes.
 constexpr int kMostNames = 10'000;
-// It limits comments to so much, but not the white space around the root element, which stays in its buffer.
+// The parser limits comments to this size, but not white space around the root element, which stays in its buffer.
 constexpr std::size_t kLongestAroundRoot = 10'000'000;
 
 std::string_view viewOf(const xmlChar* text)
@@ -41,7 +41,7 @@ std::string_view viewOf(const xmlChar* begin, const xmlChar* end)
     return {reinterpret_cast<const char*>(begin), static_cast<std::size_t>(end - begin)};
 }
 
-/// Line and column as an error carries them.
+/// Adds line and column to an error.
 void addPosition(Error& error, XMLPosition position)
 {
     error.userInfo["line"] = position.line;
@@ -50,7 +50,7 @@ void addPosition(Error& error, XMLPosition position)
 
 } // namespace
 
-/// libxml2 pulls the bytes, and its events go to the handler. Nothing is thrown through the C library's frames.
+/// Pulls the bytes for libxml2 and passes its events to the handler. No exception crosses the C library's frames.
 class XMLParser::Implementation {
 public:
     Implementation(InputStream& stream, XMLHandler& handler) : input_(stream), handler_(handler) {}
@@ -94,14 +94,14 @@ private:
     }
     void start(const xmlChar* name, const xmlChar* prefix, int namespaces, const xmlChar** namespacePairs,
                int attributes, const xmlChar** attributeRows, std::size_t bytesRead);
-    /// A name as it is written, out of the two parts into which the parser takes it; valid during the event.
+    /// The qualified name, joined from the two parts into which the parser splits it; valid during the event.
     std::string_view written(const xmlChar* prefix, const xmlChar* name)
     {
         if (prefix == nullptr) [[likely]]
             return nameAt(name);
         return ((keptNames_.emplace_front(viewOf(prefix)) += ':') += viewOf(name));
     }
-    /// The parser keeps one copy of each name to the end: most are as long as when they were met before.
+    /// The parser keeps one copy of each name until the end, and most names have the length that they had before.
     std::string_view nameAt(const xmlChar* name)
     {
         std::string_view& met = metNames_[reinterpret_cast<std::uintptr_t>(name) / 4 % metNames_.size()];
@@ -129,12 +129,12 @@ private:
     libxml2::XMLInput input_;
     XMLHandler& handler_;
     std::vector<XMLAttribute> attributes_;     // of the element that begins
-    std::forward_list<std::string> keptNames_; // that had to be joined
+    std::forward_list<std::string> keptNames_; // names that had to be joined
     std::array<std::string_view, 64> metNames_;
     int maximumDepth_ = kXMLMaximumDepth;
-    std::vector<int> namespaces_{0}; // in force at each depth, from that of no element on
+    std::vector<int> namespaces_{0}; // in force at each depth, from outside the root on
     std::size_t stretch_ = 0;        // bytes read since the last event
-    std::size_t longestStretch_ = 0; // how many there may be
+    std::size_t longestStretch_ = 0; // limit of stretch_ where the parser stands
     bool stopped_ = false;
     std::optional<Error> error_;
     std::exception_ptr thrown_;
@@ -144,10 +144,10 @@ private:
 xmlSAXHandler XMLParser::Implementation::handlers()
 {
     xmlSAXHandler sax{};
-    sax.initialized = XML_SAX2_MAGIC; // without it the process-wide error handlers would be called
+    sax.initialized = XML_SAX2_MAGIC; // prevents calls of the process-wide error handlers
     sax.startElementNs = onStart;
     sax.endElementNs = onEnd;
-    // One function for both spares the parser the look for white space.
+    // One function for both saves the parser the check for white space.
     sax.characters = sax.ignorableWhitespace = sax.cdataBlock = onCharacters;
     sax.comment = [](void* self, const xmlChar*) { static_cast<Implementation*>(self)->stretch_ = 0; };
     sax.processingInstruction = onProcessingInstruction;
@@ -183,7 +183,7 @@ void XMLParser::Implementation::start(const xmlChar* name, const xmlChar* prefix
                                       const xmlChar** namespacePairs, int attributes, const xmlChar** attributeRows,
                                       std::size_t bytesRead)
 {
-    // A tag that is cut off by the end of the document, or by what no tag may hold, is told before its error.
+    // The parser reports a tag that is cut off, or that holds what no tag may hold, before its error.
     const xmlChar* behind = context_->input->cur;
     if (behind[0] != '>' && !(behind[0] == '/' && behind[1] == '>'))
         return;
@@ -193,7 +193,7 @@ void XMLParser::Implementation::start(const xmlChar* name, const xmlChar* prefix
     if (namespaces_.back() > kMostNamespaces)
         return fail(XML_ERR_INTERNAL_ERROR, "too many namespaces are in force");
     refuseManyNames();
-    if (bytesRead > kLongestTag / 2) // less than that of a long tag can have been there before
+    if (bytesRead > kLongestTag / 2) // at most the other half was read before
         refuseLongTag();
     if (stopped_)
         return;
@@ -230,7 +230,7 @@ void XMLParser::Implementation::onCharacters(void* self, const xmlChar* text, in
 
 void XMLParser::Implementation::onError(void* self, xmlErrorPtr error)
 {
-    // What is not fatal leaves the document well-formed; names are taken as they are written, whatever namespaces say.
+    // Errors that are not fatal leave the document well-formed. Names are taken as written, whatever namespaces say.
     if (error->level != XML_ERR_FATAL || error->domain == XML_FROM_NAMESPACE)
         return;
     auto& parser = *static_cast<Implementation*>(self);
@@ -239,7 +239,7 @@ void XMLParser::Implementation::onError(void* self, xmlErrorPtr error)
         while (message.ends_with('\n'))
             message.pop_back();
         std::replace(message.begin(), message.end(), '\n', ' ');
-        // The message quotes the document, which may have names of any length.
+        // The message quotes the document, whose names may have any length.
         parser.fail(error->code, message.empty() || message.size() > 200 ? "it is not well-formed" : message);
     });
 }
@@ -250,7 +250,7 @@ void XMLParser::Implementation::refuseDeclaration(void* self)
     parser.handle([&] { parser.fail(XML_ERR_INTERNAL_ERROR, "a declaration inside the DOCTYPE"); });
 }
 
-/// Called for what is none of the predefined entities.
+/// Called for every entity that is not predefined.
 xmlEntityPtr XMLParser::Implementation::refuseEntity(void* self, const xmlChar*)
 {
     auto& parser = *static_cast<Implementation*>(self);
@@ -273,8 +273,8 @@ int XMLParser::Implementation::onRead(void* self, char* buffer, int length)
     return static_cast<int>(text.size());
 }
 
-/// Nothing once it is stopped: the document ends there for the parser, which may not be stopped by force while it holds
-/// pointers into its buffer.
+/// Returns nothing once parsing is stopped, which ends the document for the parser. It must not be stopped by force
+/// while it holds pointers into its buffer.
 std::string_view XMLParser::Implementation::read(std::size_t most)
 {
     refuseLongStretch();
@@ -285,8 +285,8 @@ std::string_view XMLParser::Implementation::read(std::size_t most)
     return text;
 }
 
-/// How much may be read without an event where the parser stands; 0: comments, CDATA sections and processing
-/// instructions come whole, and it limits them itself. Text comes in small pieces.
+/// How many bytes may be read without an event in the parser's current state; 0 for no limit: comments, CDATA sections
+/// and processing instructions come whole, and libxml2 limits them itself. Text comes in small pieces.
 std::size_t XMLParser::Implementation::longestStretch() const
 {
     switch (context_->instate) {
@@ -317,7 +317,7 @@ void XMLParser::Implementation::refuseLongStretch()
         fail(XML_ERR_INTERNAL_ERROR, "there is too much around the root element");
 }
 
-/// At the end of a tag: its own bytes count, wherever in the document it stands.
+/// Called at the end of a tag; counts only the tag's own bytes.
 void XMLParser::Implementation::refuseLongTag()
 {
     const std::string_view behind = viewOf(context_->input->base, context_->input->cur);
@@ -364,12 +364,12 @@ bool XMLParser::Implementation::parse(Error* error)
     context_.reset(xmlCreateIOParserCtxt(&sax, this, onRead, nullptr, this, XML_CHAR_ENCODING_NONE));
     if (context_ == nullptr)
         throw std::bad_alloc();
-    // Pulled, not pushed: the push parser is quadratic on long CDATA sections. XML_PARSE_NOENT is for the predefined
-    // entities, the only ones that there are: without it "&amp;" in an attribute would be handed over as "&#38;".
+    // Pulled rather than pushed, because the push parser is quadratic in long CDATA sections. XML_PARSE_NOENT replaces
+    // the predefined entities, the only ones allowed: without it "&amp;" in an attribute would be passed on as "&#38;".
     const int huge = maximumDepth_ > kXMLMaximumDepth ? XML_PARSE_HUGE : 0;
     xmlCtxtUseOptions(context_.get(), XML_PARSE_NONET | XML_PARSE_IGNORE_ENC | XML_PARSE_NOENT | huge);
     xmlParseDocument(context_.get());
-    // What ended the input is the cause; that the document is cut off then follows.
+    // A failure of the input is the cause; the parser's own complaint about a document that is cut off follows from it.
     if (input_.failed() && !thrown_) {
         Error cause = input_.error();
         if (cause.domain == kXMLErrorDomain)
@@ -401,7 +401,7 @@ XMLPosition XMLParser::Implementation::elementPosition() const
     XMLPosition found = position();
     if (found.line == 0)
         return found;
-    // The parser stands behind the attributes, none of which may hold a '<'.
+    // The parser stands behind the attributes, which cannot contain '<'.
     const std::string_view behind = viewOf(context_->input->base, context_->input->cur);
     const std::size_t begin = behind.rfind('<');
     if (begin == behind.npos)
@@ -416,7 +416,7 @@ XMLPosition XMLParser::Implementation::elementPosition() const
     if (breaks == 0) {
         found.column -= std::min(characters(tag), found.column - 1);
     } else {
-        // The start of the line may have left the parser's buffer.
+        // The start of the line may no longer be in the parser's buffer.
         const std::size_t lineBreak = behind.rfind('\n', begin);
         const bool isThere = lineBreak != behind.npos || context_->input->consumed == 0;
         found.column =

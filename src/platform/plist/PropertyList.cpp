@@ -13,7 +13,7 @@ bool isBinary(BytesView bytes)
     return textOf(bytes).starts_with("bplist");
 }
 
-/// Whether the bytes may be XML: the first that is no white space is "<", or they begin with a byte order mark.
+/// Whether the bytes may be XML: they begin with a byte order mark, or with "<" after any white space.
 bool mayBeXML(BytesView bytes)
 {
     const std::string_view text = textOf(bytes);

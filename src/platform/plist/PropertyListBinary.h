@@ -17,7 +17,8 @@ namespace platform::plist {
 
 inline constexpr std::string_view kBinaryHeader = "bplist00";
 
-/// The high four bits of an object's first byte. The low ones are the size or count, or 15 when an integer object
+/// The high four bits of an object's first byte. The low bits are the size or count, or 15 if an integer object with
+/// the count follows.
 /// with the count follows.
 enum class BinaryKind : std::uint8_t {
     simple = 0x0,  // low bits: 8 false, 9 true
@@ -40,21 +41,21 @@ struct BinaryTrailer {
     Packed<std::uint64_t> topObject;         // 16
     Packed<std::uint64_t> offsetTableOffset; // 24
 
-    /// From the order of the file to the host's, or back.
+    /// Converts from the file's byte order to the host's, or back.
     void byteOrder();
 };
 static_assert(sizeof(BinaryTrailer) == 32);
 
-/// What the unfolded values of a list of `bytes` bytes may cost.
+/// The limit for the total cost of the unfolded values of a list of `bytes` bytes.
 constexpr std::uint64_t unfoldingBudget(std::uint64_t bytes)
 {
     return 256 * bytes + 64 * 1024;
 }
-/// What one value costs, its text and data not counted; in a dictionary, with its share of the tree.
+/// Cost of one value apart from its text and data; in a dictionary it includes a share of the tree.
 inline constexpr std::uint64_t kElementCost = sizeof(Value);
 inline constexpr std::uint64_t kEntryCost = sizeof(Value) + sizeof(std::string) + 64;
 
-/// Eight bytes at a time; the last ones once more where they do not fill eight.
+/// Tests eight bytes at a time; the last eight overlap if the size is no multiple of eight.
 inline bool isASCII(std::string_view text)
 {
     constexpr std::uint64_t highBits = 0x8080808080808080;
@@ -72,9 +73,9 @@ inline bool isASCII(std::string_view text)
     return ((together | word) & highBits) == 0;
 }
 
-/// False, with `problem`, when the bytes are not whole and sound.
+/// False, with `problem`, if the bytes are incomplete or malformed.
 bool readBinary(BytesView bytes, Value& value, std::string& problem, PropertyListReading reading);
-/// False, with `problem`, when the value is none that a list can hold.
+/// False, with `problem`, if a list cannot hold the value.
 bool writeBinary(const Value& value, Bytes& bytes, std::string& problem);
 
 } // namespace platform::plist

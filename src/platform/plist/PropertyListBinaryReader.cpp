@@ -13,7 +13,7 @@ namespace platform::plist {
 
 namespace {
 
-/// A big-endian unsigned number of as many bytes as the field has, at most 8.
+/// A big-endian unsigned number that fills the field, which has at most 8 bytes.
 std::uint64_t unsignedNumber(BytesView field)
 {
     std::uint64_t number = 0;
@@ -59,7 +59,7 @@ private:
         problem_ = problem;
         return false;
     }
-    /// The object alone is not to be had: null where that is let pass.
+    /// Leaves a null in place of an object that cannot be read, if that is allowed.
     bool leaveOut(Value& value, const char* problem)
     {
         value = Value();
@@ -203,7 +203,7 @@ bool Reader::readCounted(BinaryKind kind, std::uint64_t count, ByteReader& in, V
 
 bool Reader::readContainer(BinaryKind kind, std::uint64_t count, ByteReader& in, int depth, Value& value)
 {
-    if (depth == kPropertyListMaximumDepth) // an object that contains itself ends here too
+    if (depth == kPropertyListMaximumDepth) // also ends an object that contains itself
         return fail("it is nested too deeply");
     const bool isArray = kind == BinaryKind::array;
     const std::uint64_t referenceCount = isArray ? count : count * 2;
@@ -239,7 +239,7 @@ bool Reader::readDictionary(BytesView references, int depth, Value& value)
                 return fail("a key is not a text");
             continue;
         }
-        // Most writers sort the keys: then each belongs at the end. Of two equal ones the last is read over the first.
+        // Most writers sort the keys, so each belongs at the end. Of two equal keys the last one wins.
         const auto entry = dictionary.try_emplace(dictionary.end(), std::move(*text));
         if (!readObject(reference(references, count + i), depth + 1, entry->second))
             return false;

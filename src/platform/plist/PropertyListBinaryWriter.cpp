@@ -13,7 +13,7 @@ namespace platform::plist {
 
 namespace {
 
-/// The fewest of 1, 2, 4 and 8 bytes that hold `number`, as a power of two.
+/// The fewest of 1, 2, 4 or 8 bytes that hold `number`, as a power of two.
 unsigned widthExponent(std::uint64_t number)
 {
     if (number <= std::numeric_limits<std::uint8_t>::max())
@@ -37,25 +37,25 @@ void writeNumber(ByteWriter& out, std::uint64_t number, unsigned exponent)
     }
 }
 
-/// First numbers the objects, a container before its content, a text once for all its uses; then writes them in
-/// that order. The order of a dictionary is that of its keys, so that equal values give equal bytes.
+/// Numbers the objects first (a container before its content, a text once for all its uses), then writes them in that
+/// order. A dictionary is ordered by its keys, so equal values give equal bytes.
 class Writer {
 public:
     explicit Writer(std::string& problem) : problem_(problem) {}
     bool write(const Value& value, Bytes& bytes);
 
 private:
-    /// A text, or any other value; references_ holds what a container refers to, from firstReference on.
+    /// A text or any other value; a container's references begin at firstReference in references_.
     struct Object {
         const Value* value = nullptr;
         const std::string* text = nullptr;
         std::size_t firstReference = 0;
     };
 
-    /// Of a table that finds the object of a text without an allocation for each.
+    /// An entry of the table that finds a text's object without an allocation per text.
     struct Slot {
         std::uint64_t hash = 0;
-        std::uint64_t number = 0; // of the object, from 1; 0 for a free slot
+        std::uint64_t number = 0; // of the object, from 1; 0 if the slot is free
     };
 
     bool number(const Value& value, int depth, std::uint64_t& index);
@@ -81,9 +81,9 @@ private:
     std::vector<Object> objects_;
     std::vector<std::uint64_t> references_;
     std::vector<std::uint64_t> offsets_;
-    std::vector<Slot> slots_;       // a power of two, at most half of them taken
+    std::vector<Slot> slots_;       // a power of two, at most half of them used
     std::size_t textCount_ = 0;     // different ones
-    std::uint64_t leastSize_ = 0;   // the file will have at least so many bytes
+    std::uint64_t leastSize_ = 0;   // the file is at least this long
     std::uint64_t sharedBytes_ = 0; // of texts, beyond their first use
     unsigned referenceExponent_ = 0;
     std::string& problem_;
@@ -168,11 +168,11 @@ bool Writer::numberText(const std::string& text, std::uint64_t& index)
     index = objects_.size();
     slot.number = index + 1;
     objects_.push_back({nullptr, &text, 0});
-    leastSize_ += 1 + text.size() / 2; // 16-bit units take at least half as many bytes as UTF-8
+    leastSize_ += 1 + text.size() / 2; // UTF-16 takes at least half as many bytes as UTF-8
     return true;
 }
 
-/// The slot of the text, or a free one that knows its hash.
+/// The slot of the text, or a free slot that has its hash.
 Writer::Slot& Writer::slotOf(const std::string& text)
 {
     if (2 * (textCount_ + 1) > slots_.size())
@@ -188,7 +188,7 @@ Writer::Slot& Writer::slotOf(const std::string& text)
 }
 
 /// Readers refuse a list whose values unfold to far more than its size, so a long text that is used very often is
-/// repeated now and then. Half of the budget is left to the values themselves.
+/// written again from time to time. Half of the budget is left to the values themselves.
 bool Writer::mayShare(const std::string& text)
 {
     if (sharedBytes_ + text.size() > unfoldingBudget(leastSize_) / 2)
@@ -240,7 +240,7 @@ void Writer::writeHead(BinaryKind kind, std::uint64_t count)
 
 void Writer::writeInteger(std::int64_t integer)
 {
-    // Only integers of 8 bytes are signed.
+    // Integers of less than 8 bytes are unsigned.
     const auto number = static_cast<std::uint64_t>(integer);
     const unsigned exponent = widthExponent(number);
     writeHead(BinaryKind::integer, exponent);

@@ -22,7 +22,7 @@ std::string_view trimmed(std::string_view text)
     return text.substr(first, text.find_last_not_of(kWhitespace) - first + 1);
 }
 
-/// Decimal, or hexadecimal after "0x", with an optional sign.
+/// Parses decimal digits, or hexadecimal ones after "0x", with an optional sign.
 bool parseInteger(std::string_view text, std::int64_t& result)
 {
     const bool isNegative = text.starts_with('-');
@@ -54,7 +54,7 @@ bool parseReal(std::string_view text, double& result)
     return error == std::errc() && end == text.data() + text.size();
 }
 
-/// The digits of a fraction of a second: "25" is a quarter. False for what is none.
+/// Parses the digits of a fraction of a second: "25" is a quarter. False for anything else.
 bool parseFraction(std::string_view digits, double& fraction)
 {
     double scale = 1;
@@ -66,8 +66,8 @@ bool parseFraction(std::string_view digits, double& fraction)
     return !digits.empty();
 }
 
-/// ISO 8601 as property lists have it, "2026-11-21T12:30:00Z", also with a fraction of a second ahead of the "Z", as
-/// some writers have it.
+/// Parses the ISO 8601 form of property lists, "2026-11-21T12:30:00Z", and the fraction of a second that some writers
+/// put before the "Z".
 bool parseDate(std::string_view text, Date& result)
 {
     constexpr std::string_view pattern = "dddd-dd-ddTdd:dd:dd";
@@ -112,7 +112,7 @@ int base64Digit(char c)
     return c == '+' ? 62 : c == '/' ? 63 : -1;
 }
 
-/// RFC 4648 with white space anywhere; padding may be missing.
+/// Decodes RFC 4648 with white space anywhere; padding may be missing.
 bool parseBase64(std::string_view text, Bytes& result)
 {
     result.reserve(text.size() / 4 * 3);
@@ -318,7 +318,7 @@ void Builder::add(Value value)
         return;
     }
     container.hasKey = false;
-    if (!value.isNull()) // one that could not be read
+    if (!value.isNull()) // null if it could not be read
         container.dictionary.insert_or_assign(container.dictionary.end(), std::move(container.key), std::move(value));
 }
 

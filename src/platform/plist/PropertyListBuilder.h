@@ -1,5 +1,5 @@
-// Builds the value of an XML property list from the parser's events: which element may stand where, and what its text
-// means.
+// Builds the value of an XML property list from the parser's events, and checks which element may stand where and what
+// its text means.
 #pragma once
 
 #include "platform/PropertyList.h"
@@ -44,9 +44,9 @@ private:
 
     const bool isLenient_;
     std::vector<Container> containers_;
-    Element leaf_ = Element::none; // the element without children that is open
+    Element leaf_ = Element::none; // the open element without children
     std::string text_;             // of the leaf
-    bool isOpen_ = false;          // within the plist element
+    bool isOpen_ = false;          // inside the plist element
     bool hasResult_ = false;
     Value result_;
     std::string problem_;

@@ -9,9 +9,9 @@
 
 namespace platform::plist {
 
-/// False, with `problem`, when the text is not well-formed or no property list.
+/// False, with `problem`, if the text is not well-formed or is not a property list.
 bool readXML(BytesView bytes, Value& value, std::string& problem, PropertyListReading reading);
-/// False, with `problem`, when the value is none that a list can hold, or XML has no form for it.
+/// False, with `problem`, if a list cannot hold the value or XML has no form for it.
 bool writeXML(const Value& value, Bytes& bytes, std::string& problem);
 
 } // namespace platform::plist

@@ -8,12 +8,12 @@ namespace platform::plist {
 
 namespace {
 
-/// Hands the events of a document to a Builder, and ends the parse when it fails.
+/// Passes the events of a document to a Builder and ends the parse if it fails.
 class XMLReader final : public XMLHandler {
 public:
     XMLReader(InputStream& stream, PropertyListReading reading) : builder_(reading), parser_(stream, *this)
     {
-        parser_.setMaximumDepth(kPropertyListMaximumDepth + 2); // "plist" around them all, a leaf within
+        parser_.setMaximumDepth(kPropertyListMaximumDepth + 2); // "plist" around the value, a leaf in it
     }
 
     bool read(Value& value, std::string& problem)

@@ -140,7 +140,7 @@ bool XMLWriter::writeEscaped(const std::string& text)
         else if (c == '>')
             out_ += "&gt;";
         else if (c == '\r')
-            out_ += "&#13;"; // readers take a bare one for a line feed
+            out_ += "&#13;"; // readers take a bare carriage return for a line feed
         else if (static_cast<unsigned char>(c) < 0x20 && c != '\t' && c != '\n')
             return fail("XML has no form for control characters");
         else
@@ -173,7 +173,7 @@ bool XMLWriter::writeDate(std::size_t depth, Date date)
 
 void XMLWriter::writeReal(std::size_t depth, double real)
 {
-    // The shortest text that reads back as the same number, whatever the locale; "inf" and "nan" are understood.
+    // The shortest text that reads back as the same number in any locale; readers understand "inf" and "nan".
     std::array<char, 64> text{};
     const auto result = std::to_chars(text.data(), text.data() + text.size(), real);
     leaf(depth, "real", {text.data(), static_cast<std::size_t>(result.ptr - text.data())});

@@ -1,4 +1,4 @@
-// The path by which system calls reach a URL's item.
+// The path that reaches a URL's item in system calls.
 #pragma once
 
 #include "platform/URL.h"
@@ -7,7 +7,7 @@
 
 namespace platform {
 
-/// Empty when the URL has no absolute path: one of another scheme or host, or a relative one. Lives as long as the URL.
+/// Empty if the URL has no absolute path: one of another scheme or host, or a relative one. Lives as long as the URL.
 inline const std::string& absolutePath(const URL& url)
 {
     static const std::string none;

@@ -52,7 +52,7 @@ Bytes encode(const Bookmark& bookmark)
     return writer.take();
 }
 
-/// Null unless every field is within its range and the bytes end where the path does.
+/// Null unless every field is in its range and the bytes end with the path.
 std::optional<Bookmark> decode(BytesView bytes)
 {
     ByteReader reader(bytes);
@@ -82,7 +82,7 @@ std::optional<Bookmark> decode(BytesView bytes)
     return bookmark;
 }
 
-/// A folder is no substitute for a file, nor a link for either; FIFOs and devices count as files here.
+/// A folder does not replace a file, nor a link either of them; FIFOs and devices count as files.
 bool sameKind(FileKind a, FileKind b)
 {
     const auto isPlain = [](FileKind kind) { return kind == FileKind::file || kind == FileKind::other; };
@@ -95,7 +95,7 @@ std::string folderOf(const std::string& path)
     return slash == 0 ? "/" : path.substr(0, slash);
 }
 
-/// The stored folder and the one around it, as far as they lie on the bookmark's file system.
+/// The stored folder and its parent, if they lie on the bookmark's file system.
 std::vector<std::string> foldersAround(const Bookmark& bookmark)
 {
     std::vector<std::string> folders;
@@ -135,7 +135,7 @@ std::optional<Bytes> makeBookmark(const URL& url, BookmarkCreationOptions option
     if (!item)
         return failed(error, errno, bookmark.path);
     bookmark.item = std::move(*item);
-    // Of a link the folder is asked, because a link's target may lie elsewhere, or nowhere.
+    // A link's file system is that of its folder, because its target may lie elsewhere, or nowhere.
     const bool isLink = bookmark.item.kind == FileKind::symbolicLink;
     bookmark.fileSystem = fileSystemIdentifier(isLink ? folderOf(bookmark.path).c_str() : bookmark.path.c_str());
     return encode(bookmark);
@@ -184,7 +184,7 @@ std::optional<Bytes> bookmarkOfAliasFile(const URL& url)
 {
     const std::string& path = absolutePath(url);
     FileStatus status;
-    // The size tells most files from aliases without opening them.
+    // The size distinguishes most files from aliases without opening them.
     if (path.empty() || !systemCalls().linkStatus(path.c_str(), &status) || status.kind != FileKind::file ||
         status.size < static_cast<std::int64_t>(kHeaderSize))
         return std::nullopt;

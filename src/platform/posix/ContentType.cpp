@@ -11,7 +11,7 @@ namespace {
 
 struct Conformance {
     std::string_view type;
-    std::string_view parent; // empty at the top; a type with two parents stands twice
+    std::string_view parent; // empty at the top; a type with two parents has two rows
 };
 
 constexpr Conformance conformances[] = {
@@ -56,7 +56,7 @@ constexpr Conformance conformances[] = {
 struct MIMEName {
     std::string_view name; // a whole type, or all of "audio/"
     std::string_view type;
-    bool isFamily = false; // stands for the types that have no line of their own, each a special case of `type`
+    bool isFamily = false; // stands for each type without a row, as a special case of `type`
 };
 
 constexpr MIMEName mimeNames[] = {
@@ -97,7 +97,7 @@ constexpr MIMEName mimeNames[] = {
     {"inode/directory", "public.folder"},
 };
 
-/// Whether the last part of a vendor's own identifier says that it is audio: "com.example.wave-audio",
+/// Whether the last part of a vendor's identifier says that it is audio: "com.example.wave-audio",
 /// "com.example.audio-format".
 bool saysAudio(std::string_view identifier)
 {
@@ -105,14 +105,13 @@ bool saysAudio(std::string_view identifier)
            (identifier.ends_with("-audio") || identifier.ends_with("audio-format"));
 }
 
-/// A type of the table, a MIME type of a family, or a vendor's; `base` is empty when the type is unknown.
+/// A type of the table, a MIME type of a family, or a vendor's type; `base` is empty if the type is unknown.
 struct Resolved {
-    std::string name;      // tells types apart
-    std::string_view base; // in the table: the type itself, or what its family stands for
+    std::string name;      // distinguishes types
+    std::string_view base; // in the table: the type itself, or the one that its family stands for
 };
 
-/// Identifiers and MIME types are the same in upper and lower case, and a MIME type with parameters
-/// ("audio/L16;rate=48000") is the type without them.
+/// Identifiers and MIME types ignore case, and a MIME type's parameters ("audio/L16;rate=48000") are dropped.
 Resolved resolve(const String& identifier)
 {
     std::string name = identifier.utf8();

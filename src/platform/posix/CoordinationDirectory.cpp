@@ -48,8 +48,8 @@ std::string ownerText(uid_t user)
     return record ? record->name + " (" + number + ")" : number;
 }
 
-/// The user's home, where that is a folder of this user in which the state folder is or can be made; else empty. The
-/// environment has no say in any of this: two processes of a user must never choose differently.
+/// The folder for state in the user's home, if the home belongs to this user and the folder exists or can be made; else
+/// empty. The environment is ignored: two processes of a user must never choose differently.
 std::string stateFolder(uid_t user)
 {
     const std::optional<UserRecord> record = userRecord(user);
@@ -63,13 +63,13 @@ std::string stateFolder(uid_t user)
     return isThere || ::faccessat(AT_FDCWD, record->home.c_str(), W_OK, AT_EACCESS) == 0 ? state : std::string();
 }
 
-/// The folder in force, then the one that is in force while the user has no run-time folder. In the folder for
-/// temporary files, where anybody may take the name, only for a user without a home.
+/// The folder in force, then the one that is in force while the user has no run-time folder. Only a user without a home
+/// gets one in the folder for temporary files, where anybody may take the name.
 std::vector<std::string> systemPaths()
 {
     static const uid_t user = ::geteuid();
     static const std::string state = stateFolder(user);
-    const uid_t now = ::geteuid(); // a process may become another user's
+    const uid_t now = ::geteuid(); // a process may change its user
     const std::string number = std::to_string(now);
     const std::string lasting = now == user ? state : stateFolder(now);
     std::vector<std::string> paths;
@@ -81,7 +81,7 @@ std::vector<std::string> systemPaths()
     return paths;
 }
 
-/// The folders around one, for this user alone.
+/// Makes the enclosing folders, for this user alone.
 void makeFoldersAround(const std::string& path)
 {
     for (std::size_t end = path.find('/', 1); end != path.npos; end = path.find('/', end + 1))
@@ -98,7 +98,8 @@ struct Current {
     std::shared_ptr<CoordinationDirectory> other;
 };
 
-std::string& chosenPath() // outlives forks, unlike what was opened; guarded by the mutex of Current
+// Unlike open descriptors, this outlives a fork. Guarded by the mutex of Current.
+std::string& chosenPath()
 {
     static std::string& path = *new std::string;
     return path;
@@ -110,7 +111,7 @@ Current& currentState()
     return state.get();
 }
 
-/// The paths that count now, with the mutex held; the folder in force is brought up to date.
+/// The paths in force; reopens the current folder if it changed. Called with the mutex held.
 std::vector<std::string> update(Current& state)
 {
     const bool isChosen = !chosenPath().empty();
@@ -144,12 +145,12 @@ std::vector<std::shared_ptr<CoordinationDirectory>> CoordinationDirectory::all()
         return {state.directory};
     struct stat status;
     if (::lstat(paths[1].c_str(), &status) != 0)
-        return {state.directory}; // nobody was ever without a run-time folder
+        return {state.directory}; // no process ran without a run-time folder
     if (!state.other || !state.other->isCurrent() || state.otherPath != paths[1])
         try {
             state.other = std::make_shared<CoordinationDirectory>(paths[1]);
             state.otherPath = paths[1];
-        } catch (const std::system_error&) { // not fit to be met in, by nobody
+        } catch (const std::system_error&) { // unusable for everybody
             state.other.reset();
             return {state.directory};
         }
@@ -176,21 +177,21 @@ CoordinationDirectory::CoordinationDirectory(const std::string& path)
     struct stat status;
     folder_ = Descriptor([&] { return ::open(path.c_str(), O_RDONLY | O_DIRECTORY | O_NOFOLLOW | O_CLOEXEC); });
     if (!folder_) {
-        const int reason = errno; // which does not say whose it is
+        const int reason = errno; // the error does not say whose folder it is
         fail(reason, ::lstat(path.c_str(), &status) != 0 ? what
                      : status.st_uid != ::geteuid()      ? what + " belongs to " + ownerText(status.st_uid)
                      : S_ISLNK(status.st_mode)           ? what + " is a link"
                                                          : what);
     }
     if (made)
-        ::fchmod(folder_.get(), kOwnerOnly); // whatever the process's mask
+        ::fchmod(folder_.get(), kOwnerOnly); // whatever the process's mask is
     if (::fstat(folder_.get(), &status) != 0)
         fail(errno, what);
     if (status.st_uid != ::geteuid())
         fail(EACCES, what + " is not this user's: it belongs to " + ownerText(status.st_uid));
     if ((status.st_mode & 07777) != kOwnerOnly)
         fail(EACCES, what + " is not this user's alone: others may enter it");
-    ::flock(folder_.get(), LOCK_SH | LOCK_NB); // whoever cleans temporary files leaves locked folders alone
+    ::flock(folder_.get(), LOCK_SH | LOCK_NB); // programs that clean temporary files spare locked folders
 }
 
 Descriptor CoordinationDirectory::openFile(const std::string& name)
@@ -225,7 +226,7 @@ Descriptor CoordinationDirectory::takeStripe(int stripe)
 
 void CoordinationDirectory::putStripe(int stripe, Descriptor descriptor)
 {
-    Descriptor dropped; // closed without the mutex
+    Descriptor dropped; // closed after the mutex is released
     const std::lock_guard lock(mutex_);
     if (kept_.size() == kKeptDescriptors) {
         dropped = std::move(kept_.front().second);

@@ -1,4 +1,5 @@
-// Who has what: the kernel shows the locks of each descriptor of a process, and the byte says what a lock means.
+// Lists who holds or awaits what. The kernel shows the locks of each descriptor of a process; the byte says what a lock
+// means.
 #include "platform/FileCoordination.h"
 
 #include "platform/posix/CoordinationDirectory.h"
@@ -25,7 +26,7 @@ struct HeldLock {
     bool isExclusive;
 };
 
-/// "lock:	1: OFDLCK ADVISORY  WRITE -1 fe:01:1234 17 17"
+/// Parses lines like "lock:        1: OFDLCK ADVISORY  WRITE -1 fe:01:1234 17 17".
 std::vector<HeldLock> locksOf(const fs::path& descriptorInformation)
 {
     std::vector<HeldLock> locks;
@@ -52,8 +53,8 @@ int stripeOf(const std::string& target, const std::string& prefix)
     return stripe >= 0 && stripe < kStripeCount ? stripe : -1;
 }
 
-/// What the locks of one descriptor say. A lock on the data byte is access; any other that is no presence waits for it:
-/// a ticket, the queue byte of a writer that asks, the mark of a reader that is parked.
+/// Interprets the locks of one descriptor. A lock on the data byte is access. Any other except a presence is a wait: a
+/// ticket, the queue byte of a writer that asks, or the mark of a parked reader.
 void addParties(int process, int stripe, const std::vector<HeldLock>& locks, std::vector<CoordinationParty>& parties)
 {
     using Role = CoordinationParty::Role;
@@ -71,7 +72,8 @@ void addParties(int process, int stripe, const std::vector<HeldLock>& locks, std
             parties.push_back({process, Role::holds, lock.isExclusive, item});
         else if (isOfWriters || isOfReaders) {
             for (const bool byWriters : {false, true})
-                if (lock.isExclusive && (byWriters ? isOfWriters : isOfReaders)) // a shared one waits for it to fall
+                // A shared lock waits for the byte to fall.
+                if (lock.isExclusive && (byWriters ? isOfWriters : isOfReaders))
                     parties.push_back({process, Role::presents, byWriters, item});
         } else if (!hasLock(window, kDataByte, kDataByte + 1))
             parties.push_back(
@@ -86,7 +88,7 @@ std::vector<CoordinationParty> partiesIn(const std::vector<std::shared_ptr<Coord
     std::vector<std::string> prefixes;
     for (const auto& folder : folders)
         prefixes.push_back(folder->path() + "/" + CoordinationDirectory::stripeName(0).substr(0, 7));
-    std::error_code ignored; // processes end while they are looked at, and those of others show nothing
+    std::error_code ignored; // processes may end meanwhile, and those of others show nothing
     for (const auto& process : fs::directory_iterator("/proc", ignored)) {
         const std::string name = process.path().filename();
         int id = 0;

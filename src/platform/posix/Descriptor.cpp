@@ -15,7 +15,7 @@ namespace platform {
 namespace {
 
 struct Table {
-    std::mutex mutex; // held across a fork, so that no descriptor is open and not listed then
+    std::mutex mutex; // held across a fork, so that every open descriptor is listed
     std::vector<int> open;
     std::array<std::atomic<void*>*, 8> forgotten{};
     std::size_t forgottenCount = 0;
@@ -32,7 +32,7 @@ struct Table {
     static void afterForkInChild()
     {
         Table& table = shared();
-        // The numbers stay taken, by something harmless: their owners may still close them in the child.
+        // The numbers stay open on something harmless, because their owners may still close them in the child.
         for (const int number : table.open) {
             ::close(number);
             const int harmless = ::open("/dev/null", O_RDONLY | O_CLOEXEC);

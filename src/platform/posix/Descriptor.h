@@ -1,8 +1,8 @@
 // Descriptors that belong to this process alone, and state that a forked child must not take over.
 //
-// A lock of an open file description lives until the last copy of its descriptor is gone. Every descriptor of the
-// coordination service is therefore opened to close on exec, and what it names is let go of in a forked child at once:
-// the child may outlive its parent, whose locks must end with the parent.
+// A lock of an open file description lives until the last copy of its descriptor is closed. Therefore every descriptor
+// of the coordination service closes on exec, and a forked child drops its copies at once: it may outlive its parent,
+// whose locks must end with the parent.
 #pragma once
 
 #include <atomic>
@@ -14,8 +14,8 @@ namespace platform {
 class Descriptor {
 public:
     Descriptor() = default;
-    /// Takes what `open` returns, which must close on exec; no fork happens meanwhile, so `open` must not wait.
-    /// Without a descriptor errno says why, and the object is false.
+    /// Takes the descriptor that `open` returns, which closes on exec. Forks wait meanwhile, so `open` must not block.
+    /// Without a descriptor the object is false and errno says why.
     explicit Descriptor(const std::function<int()>& open);
     Descriptor(Descriptor&& other) noexcept : number_(std::exchange(other.number_, -1)) {}
     Descriptor& operator=(Descriptor&& other) noexcept
@@ -32,11 +32,11 @@ private:
     int number_ = -1;
 };
 
-/// Registers a word of memory that a forked child sets to null; at most eight, all of static lifetime.
+/// Registers a pointer that is set to null in a forked child; at most eight, all of static lifetime.
 void forgetInForkedChild(std::atomic<void*>& pointer);
 
-/// One object per process, made on first use and never destroyed: threads may still use it while the process exits. A
-/// forked child makes its own; the parent's is left behind as it is, locked mutexes included.
+/// One object per process, made on first use and never destroyed, because threads may use it while the process exits. A
+/// forked child makes its own and leaves the parent's as it is, locked mutexes included.
 template <class T>
 class PerProcess {
 public:

@@ -14,7 +14,7 @@ namespace {
 constexpr std::size_t kMaxDesktopEntrySize = 64 * 1024;
 
 /// The keys under which a desktop entry (freedesktop.org, Desktop Entry 1.5) may hold the name, best first: for
-/// "de_AT.UTF-8@euro" that is Name[de_AT@euro], Name[de_AT], Name[de@euro], Name[de], Name.
+/// "de_AT.UTF-8@euro" these are Name[de_AT@euro], Name[de_AT], Name[de@euro], Name[de], Name.
 std::vector<std::string> nameKeys()
 {
     std::string locale;
@@ -49,7 +49,7 @@ std::string_view trimmed(std::string_view text)
     return begin == text.npos ? std::string_view() : text.substr(begin, text.find_last_not_of(" \t\r") + 1 - begin);
 }
 
-/// A value without its escapes. Those for line ends and tabs become spaces: a name is one line.
+/// Removes a value's escapes. Escaped line ends and tabs become spaces, because a name is one line.
 std::string unescaped(std::string_view value)
 {
     std::string text;
@@ -67,7 +67,7 @@ std::string unescaped(std::string_view value)
     return text;
 }
 
-/// The name in the entry's main group, empty when there is none.
+/// The name in the entry's main group; empty if there is none.
 std::string nameInDesktopEntry(std::string_view entry)
 {
     const std::vector<std::string> keys = nameKeys();

@@ -26,7 +26,7 @@ timespec systemTime(const FileTime& time)
     return converted;
 }
 
-// The attributes that the system keeps for itself are there already, or are not ours to set.
+// The system's own attributes are there already, or cannot be set by us.
 bool isOurs(const char* name)
 {
     return std::strncmp(name, "user.", 5) == 0 || std::strncmp(name, "system.posix_acl_", 17) == 0;

@@ -26,7 +26,7 @@ bool failOfInvalidItem(Error* error)
     return fail(error, ErrorDomain::status, kStatusBadReference, "file coordination: a URL without a path");
 }
 
-/// In every folder in which others may look, mostly one.
+/// One access in each folder in which others may look; mostly there is one.
 struct OpenAccess final : CoordinatedAccess {
     OpenAccess(const CoordinatedItem& coordinated, const FilePresenter* own) : CoordinatedAccess(coordinated.url())
     {
@@ -78,7 +78,7 @@ bool FileCoordinator::coordinateReading(const CoordinatedItem& item, ReadingOpti
 bool FileCoordinator::coordinateWriting(const CoordinatedItem& item, WritingOptions, const Accessor& accessor,
                                         Error* error) const
 {
-    return coordinate(item, Kind::writing, accessor, error); // replacing asks the same of everybody
+    return coordinate(item, Kind::writing, accessor, error); // replacing asks everybody the same as writing
 }
 
 bool FileCoordinator::coordinateAcquiring(const CoordinatedItem& item, const Accessor& accessor, Error* error) const
@@ -149,7 +149,8 @@ std::unique_ptr<CoordinatedAccess> FileCoordinator::open(const CoordinatedItem& 
                     place.acquireForWriting(kind == Kind::writing);
             if (access->isSeen())
                 return access;
-            PresenterRegistry::shared().followFolder(); // or nobody there would ask the presenter that acquires this
+            // Otherwise nobody there would ask the presenter that acquires this.
+            PresenterRegistry::shared().followFolder();
         } catch (const std::system_error& failure) {
             if (failure.code().value() != ESTALE && (!directory || directory->isCurrent())) {
                 failOf(failure, error);

@@ -33,7 +33,7 @@ std::optional<FileTime> fileDate(const char* path, FileDate date)
 bool setFileDate(const char* path, FileDate date, const FileTime& time)
 {
     if (date == FileDate::creation) {
-        if (fileDate(path, FileDate::modification)) // else there is a better reason
+        if (fileDate(path, FileDate::modification)) // otherwise fileDate has set a better error
             errno = EOPNOTSUPP;
         return false;
     }
@@ -51,7 +51,7 @@ bool touchFile(const char* path)
 
 std::int64_t localOffsetFromUTC(std::int64_t time)
 {
-    tzset(); // localtime_r need not look whether the zone was changed
+    tzset(); // afterwards localtime_r need not check whether the zone changed
     const std::time_t seconds = time;
     std::tm local = {};
     return localtime_r(&seconds, &local) != nullptr ? local.tm_gmtoff : 0;

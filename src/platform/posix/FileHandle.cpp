@@ -12,14 +12,14 @@ namespace platform {
 
 namespace {
 
-/// What lies in the block, in host order: it never leaves the process. The inode is never zero in a block in use.
+/// The block's content in host order, since it never leaves the process. The inode of a block in use is never zero.
 struct HandleLayout {
     std::uint64_t device;           //  0
     std::uint64_t inode;            //  8
     std::int64_t birthSeconds;      // 16
     std::uint32_t birthNanoseconds; // 24
     std::int32_t handleType;        // 28
-    std::uint32_t handleSize;       // 32  0: not known, or longer than the room for it
+    std::uint32_t handleSize;       // 32  0: not known, or longer than the array
     std::array<std::byte, 28> handle;
     std::array<char, PATH_MAX> path; // 64  NUL-terminated
 };
@@ -47,7 +47,7 @@ ItemIdentity identityOf(const HandleLayout& layout)
     return identity;
 }
 
-/// The path at which the handle's item is now, in the folder where it was; null when it is not there.
+/// The path at which the handle's item now is, within its former folder; null if it is not there.
 std::optional<std::string> currentPath(const FileHandle& block)
 {
     const std::optional<HandleLayout> layout = layoutOf(block);

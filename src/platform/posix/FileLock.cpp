@@ -8,7 +8,7 @@ namespace platform {
 
 namespace {
 
-constexpr ByteRange kWhole{0, 0}; // to the end, wherever that is
+constexpr ByteRange kWhole{0, 0}; // to the end of the file
 
 } // namespace
 

@@ -12,7 +12,7 @@ namespace platform {
 
 namespace {
 
-/// The extensions of the suite's project packages, old kinds included.
+/// The extensions of the suite's project packages, including the old kinds.
 constexpr std::string_view kPackageExtensions[] = {"fuguex", "band", "concert", "grid", "mwand"};
 
 } // namespace
@@ -28,8 +28,8 @@ std::shared_ptr<const Bytes> volumeIdentifier(const URL& url)
     if (path.empty() || statx(AT_FDCWD, path.c_str(), AT_SYMLINK_NOFOLLOW | AT_NO_AUTOMOUNT, wanted, &found) != 0)
         return nullptr;
 
-    // The number of the mount, where the kernel tells it: a file can only be renamed within its mount, while overlay
-    // file systems give the files of one mount different devices.
+    // The mount's number, if the kernel tells it. A file can be renamed only within its mount, while overlay file
+    // systems give files of one mount different devices.
     ByteWriter writer;
 #ifdef STATX_MNT_ID
     if ((found.stx_mask & STATX_MNT_ID) != 0)

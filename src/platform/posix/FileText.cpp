@@ -31,7 +31,7 @@ std::string decodeLatin1(std::string_view bytes)
 
 FileText decodeFileText(std::string_view bytes, FallbackEncoding fallback)
 {
-    if (isASCII(bytes) || !String::fromUTF8(bytes).isNull()) // most are the first, which is told without a copy
+    if (isASCII(bytes) || !String::fromUTF8(bytes).isNull()) // most files are ASCII, which needs no copy to check
         return {std::string(bytes)};
     if (fallback == FallbackEncoding::macintosh)
         return {decodeText(bytes, kTextEncodingWestern).utf8(), "macintosh"};

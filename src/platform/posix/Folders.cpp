@@ -33,7 +33,7 @@ bool isFolder(const std::string& path)
     return status.kind == FileKind::directory;
 }
 
-/// One item to remove: a folder is removed when it is met for the second time, behind what was in it.
+/// One item to remove. A folder is removed at its second visit, after its content.
 struct Removal {
     std::string path;
     bool isEmptied = false;
@@ -69,13 +69,13 @@ bool createFolders(const std::string& path)
     if (errno != ENOENT)
         return false;
     const SystemCalls& calls = systemCalls();
-    // From the top, each component once: what is there already says so.
+    // Works from the top down, each component once, because an existing folder answers for those above it.
     std::size_t end = 0;
     do {
         end = path.find('/', end + 1);
         const std::string folder = path.substr(0, end);
         if (calls.createFolder(folder.c_str(), kFolderPermissions) != 0) {
-            const int reason = errno; // a read-only place says so even of folders that are there
+            const int reason = errno; // a read-only place gives this error even for existing folders
             if (!isFolder(folder)) {
                 errno = reason == EEXIST ? ENOTDIR : reason;
                 return false;

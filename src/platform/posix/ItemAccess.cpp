@@ -9,7 +9,7 @@ namespace platform {
 
 namespace {
 
-/// For how long an answer is awaited with the data byte in hand.
+/// How long answers are awaited with the data byte locked.
 constexpr std::chrono::milliseconds kMoment{2};
 
 } // namespace
@@ -32,7 +32,7 @@ ItemAccess::~ItemAccess()
         unlock(number(), window_.whole());
         directory_->putStripe(window_.stripe, std::move(stripe_));
     } catch (const std::exception&) {
-        // Closing the descriptor gives the locks back.
+        // Closing the descriptor releases the locks.
     }
 }
 
@@ -55,13 +55,24 @@ void ItemAccess::acquireForWriting(bool mayGoFirst)
     isAcquired_ = true;
 }
 
-/// Nobody comes to hold the item for longer while the queue is ours, save by answering us later: what was agreed stays
-/// so, and readers pass meanwhile.
+/// Takes the writer's turn, then asks every presenter, then takes the data. The order of the locks, all of which the
+/// kernel drops if the process dies:
+///
+/// 1. A ticket (unless nobody waits), until all lower ones are gone. Others queue behind it.
+/// 2. Queue and asking byte, in one step. Writers now wait; readers see the asking byte and pass the waiting writers.
+/// 3. Questions to the presenters, without the ticket, so that readers that come meanwhile get through.
+/// 4. The data byte, for which a ticket holds back new readers again. The asking byte falls, then the ticket.
+/// 5. One more look for presenters. If there is a new one, the asking byte is taken again, the data byte is released,
+/// and 3 follows; otherwise access begins.
+///
+/// While the queue is ours, no other writer can acquire a lock that it presents, so an agreement from 3 stays valid
+/// until 5. A process that is killed at any step leaves nothing behind: its tickets and bytes fall, the next waiter
+/// wakes, and the presenters find the connection closed and forget the question.
 void ItemAccess::acquireInQueue()
 {
     const ByteRange turn = window_.range(kQueueByte, 2);
     static_assert(kAskingByte == kQueueByte + 1);
-    // The look comes first: who is about to take his turn must not find it taken for the moment of a look.
+    // The look comes first: a writer that is about to take its turn must not find it taken for the moment of a look.
     if (someoneWaits() || !tryLock(number(), turn, LockKind::exclusive)) {
         takeTicket(kWriterTickets);
         awaitTickets({kWriterTickets, kReaderTickets});
@@ -71,7 +82,7 @@ void ItemAccess::acquireInQueue()
         askInQueue();
         if (!lockNow(kDataByte, LockKind::exclusive)) {
             if (!ticket_)
-                takeTicket(kWriterTickets); // holds back those who come now
+                takeTicket(kWriterTickets); // holds back those who come from now on
             unlockByte(kAskingByte);
             waitForLock(number(), window_.range(kDataByte), LockKind::exclusive);
         } else {
@@ -85,13 +96,13 @@ void ItemAccess::acquireInQueue()
     }
 }
 
-/// Those who are present now. Whoever has come meanwhile is found by the look that follows with data in hand.
+/// Asks those who are present now. Whoever comes meanwhile is found by the look that follows under the data byte.
 void ItemAccess::askInQueue()
 {
     const std::vector<int> present = presentSlots(true);
     if (present.empty())
         return;
-    dropTicket(kWriterTickets); // the asking byte is ours: readers behind us look again, and pass
+    dropTicket(kWriterTickets); // while the asking byte is ours, readers behind us look again and pass
     spent_.clear();
     Questions questions(*directory_, spent_);
     const std::vector<int> unreachable = ask(questions, present, true, true);
@@ -100,8 +111,9 @@ void ItemAccess::askInQueue()
     awaitAbsence(unreachable, true);
 }
 
-/// Without the queue, an agreement counts only when it was given while the data byte was ours: nobody can come to hold
-/// the item for longer meanwhile. Whoever takes longer to answer is awaited with nothing in hand, and then asked again.
+/// Without the queue, an agreement counts only if it was given while the data byte was ours, because nobody can acquire
+/// a presented lock meanwhile. Answers that take longer are awaited with nothing held, and the presenters are then
+/// asked again. A process that dies while parked leaves only the mark for listings, which falls with it.
 void ItemAccess::acquireAskingUnderData(LockKind kind, bool isWriter)
 {
     for (;;) {
@@ -126,7 +138,7 @@ void ItemAccess::acquireAskingUnderData(LockKind kind, bool isWriter)
     }
 }
 
-/// Data, and nobody who waits or presents.
+/// Takes the data byte; succeeds if nobody waits or presents.
 bool ItemAccess::tryToAcquireForReading()
 {
     if (!lockNow(kDataByte, LockKind::shared))
@@ -137,7 +149,7 @@ bool ItemAccess::tryToAcquireForReading()
     return false;
 }
 
-/// Queue and data in one step, and nobody who waits or presents.
+/// Takes queue and data byte in one step; succeeds if nobody waits or presents.
 bool ItemAccess::tryToAcquireForWriting()
 {
     const ByteRange both = window_.range(kDataByte, 2);
@@ -150,7 +162,7 @@ bool ItemAccess::tryToAcquireForWriting()
     return false;
 }
 
-/// Looked up anew each time, with the queue or data in hand: another presenter here may have come to hold the item
+/// Looked up each time, with the queue or data byte held: another presenter of this process may have acquired the item
 /// meanwhile.
 std::optional<std::int64_t> ItemAccess::ownPresence() const
 {
@@ -159,7 +171,7 @@ std::optional<std::int64_t> ItemAccess::ownPresence() const
     return PresenterRegistry::shared().presenceOfOnly(own_, key_, *directory_);
 }
 
-/// Whether an exclusive lock of others lies from one offset up to another, our own presence apart.
+/// Whether another description holds an exclusive lock in [from, to), apart from our own presence.
 bool ItemAccess::someoneIsThere(std::int64_t from, std::int64_t to)
 {
     const auto own = ownPresence();
@@ -169,8 +181,8 @@ bool ItemAccess::someoneIsThere(std::int64_t from, std::int64_t to)
            (*own + 1 < to && findExclusiveLock(number(), window_.range(*own + 1, to - *own - 1)));
 }
 
-/// The data byte alone, without the queue. First come, first served, save that writers behind one that asks are passed:
-/// it may have to wait for long, and for somebody who lets this access through.
+/// Takes the data byte alone, without the queue. First come, first served, except that writers behind one that asks are
+/// passed: it may wait for long, and for somebody who lets this access through.
 void ItemAccess::takeData(LockKind kind)
 {
     if (lockNow(kDataByte, kind)) {
@@ -196,11 +208,11 @@ bool ItemAccess::someoneWaits()
     return findExclusiveLock(number(), window_.range(kWriterTickets, 2 * kTicketCount)).has_value();
 }
 
-/// One past the last ticket that is taken. Each query costs the kernel a walk over all who wait, so it is found by
-/// leaps that double, then halve, not one by one.
+/// One past the last ticket taken. Each query makes the kernel walk over all waiters, so the search leaps, doubling and
+/// then halving the step.
 std::int64_t ItemAccess::nextTicket(std::int64_t tickets)
 {
-    std::int64_t next = 0, end = kTicketCount, leap = 0; // taken below `next` alone, free from `end` on
+    std::int64_t next = 0, end = kTicketCount, leap = 0; // all from `end` on are free
     while (next < end) {
         const std::int64_t from = std::min(next + leap, end - 1);
         if (const auto taken = findExclusiveLock(number(), window_.range(tickets + from, end - from))) {
@@ -214,8 +226,7 @@ std::int64_t ItemAccess::nextTicket(std::int64_t tickets)
     return next;
 }
 
-/// Takes the number behind the last. When the numbers are used up there is none to take, and it is behind all that have
-/// one.
+/// Takes the number after the last. When all numbers are used up it takes none and waits for all that have one.
 void ItemAccess::takeTicket(std::int64_t tickets)
 {
     std::int64_t writers = 0, readers = 0;
@@ -238,8 +249,8 @@ void ItemAccess::dropTicket(std::int64_t tickets)
     ticket_.reset();
 }
 
-/// Waits until no number below ours is taken in these ranges. The one just ahead is awaited first, so that each waiter
-/// is woken by one; then all, should that one have been killed or passed.
+/// Waits until no lower number is taken in these ranges: first for the one just ahead, so that each release wakes one
+/// waiter, then for all, in case that one was killed or passed.
 void ItemAccess::awaitTickets(std::initializer_list<std::int64_t> ranges)
 {
     if (*ticket_ == 0)
@@ -265,7 +276,7 @@ std::optional<ByteRange> ItemAccess::lowestWriterAhead()
     return lowest;
 }
 
-/// The slots whose processes have to be asked still: those that agreed are not, nor our own presenter.
+/// The slots that are still to be asked, without those that agreed and our own presenter.
 std::vector<int> ItemAccess::presentSlots(bool isWriter)
 {
     std::vector<std::int64_t> present;
@@ -283,12 +294,12 @@ std::vector<int> ItemAccess::presentSlots(bool isWriter)
             slots.push_back(slot);
     }
     std::sort(slots.begin(), slots.end());
-    slots.erase(std::unique(slots.begin(), slots.end()), slots.end()); // of the two kinds that a process may have
+    slots.erase(std::unique(slots.begin(), slots.end()), slots.end()); // a process may have presences of two kinds
     return slots;
 }
 
-/// The presence bytes from one offset up to another. A query gives any lock of its range, so the rest is left on both
-/// sides of it.
+/// Collects the presence bytes in [from, to). A query returns any lock in its range, so both sides of it are searched
+/// further.
 void ItemAccess::findPresent(std::int64_t from, std::int64_t to, std::vector<std::int64_t>& present)
 {
     if (from >= to)
@@ -304,7 +315,7 @@ void ItemAccess::findPresent(std::int64_t from, std::int64_t to, std::vector<std
     findPresent(end, to, present);
 }
 
-/// Gives back the slots at which nobody listens.
+/// Returns the slots where nobody listens.
 std::vector<int> ItemAccess::ask(Questions& questions, const std::vector<int>& slots, bool isWriter, bool holdsQueue)
 {
     Request request;
@@ -320,7 +331,7 @@ std::vector<int> ItemAccess::ask(Questions& questions, const std::vector<int>& s
     return unreachable;
 }
 
-/// Who has just ended, or cannot be reached, is absent when its presence bytes fall.
+/// Waits until processes that ended or cannot be reached are absent, which their presence bytes show.
 void ItemAccess::awaitAbsence(const std::vector<int>& slots, bool ofWriters)
 {
     for (const int slot : slots)

@@ -1,4 +1,4 @@
-// One coordinated access to one item, from asking for it to giving it back.
+// One coordinated access to one item, from the request to the release.
 #pragma once
 
 #include "platform/posix/CoordinationDirectory.h"
@@ -14,23 +14,23 @@ namespace platform {
 
 class FilePresenter;
 
-/// All locks lie on one open file description of its own. Whatever goes wrong, dropping that gives them back.
+/// All locks belong to one open file description. Dropping it releases them, whatever goes wrong.
 class ItemAccess {
 public:
-    /// `own` is the asking coordinator's presenter, or null.
+    /// `own` is the presenter of the asking coordinator, or null.
     ItemAccess(std::shared_ptr<CoordinationDirectory> directory, const SHA256Digest& key, const FilePresenter* own);
     ~ItemAccess();
     ItemAccess(const ItemAccess&) = delete;
     ItemAccess& operator=(const ItemAccess&) = delete;
 
-    /// These wait until access is had, and throw std::system_error when the system refuses. `mayGoFirst`: not to wait
-    /// for the queue while `own` owes an answer to the writer that keeps it.
+    /// These wait for access, and throw std::system_error if the system refuses. `mayGoFirst`: does not wait for the
+    /// queue while `own` owes an answer to the writer that holds it.
     void acquireForReading();
     void acquireForWriting(bool mayGoFirst);
-    /// These do not wait: false, and nothing is held, when somebody has, presents or waits for the item.
+    /// These do not wait: false, with nothing held, if somebody else has, presents or awaits the item.
     bool tryToAcquireForReading();
     bool tryToAcquireForWriting();
-    /// False when what was acquired is worth nothing, because the folder was deleted meanwhile.
+    /// False if the folder was deleted meanwhile, so that what was acquired excludes nobody.
     bool isSeen() { return directory_->stillThere(stripe_); }
 
 private:
@@ -61,7 +61,7 @@ private:
     const FilePresenter* own_;
     std::vector<int> agreed_;            // slots
     std::optional<std::int64_t> ticket_; // kTicketCount: behind all that have one
-    std::vector<Descriptor> spent_;      // sockets of questions that were answered, closed when access ends
+    std::vector<Descriptor> spent_;      // sockets of answered questions, closed when access ends
     Descriptor stripe_;
     bool isAcquired_ = false;
 };

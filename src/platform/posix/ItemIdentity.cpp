@@ -22,7 +22,7 @@ FileKind kindOf(unsigned mode)
 
 void readHandle(const char* path, ItemIdentity& identity)
 {
-    // The kernel's struct ends in an array of any length: the bytes behind it are that array.
+    // The kernel's struct ends in an array of variable length, for which the bytes behind it are reserved.
     alignas(file_handle) std::byte storage[sizeof(file_handle) + MAX_HANDLE_SZ] = {};
     auto* handle = reinterpret_cast<file_handle*>(storage);
     handle->handle_bytes = MAX_HANDLE_SZ;

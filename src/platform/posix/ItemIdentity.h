@@ -1,4 +1,4 @@
-// What tells one item of a file system from every other, the later users of its inode number included.
+// What distinguishes an item of a file system from every other, including later users of its inode number.
 #pragma once
 
 #include "platform/SystemCalls.h"
@@ -9,29 +9,29 @@
 
 namespace platform {
 
-/// Inode numbers are used again once their item is gone; the birth time and the bytes of the kernel's file handle
-/// (which hold the inode's generation) are not. File systems have both, one of them, or none.
+/// Inode numbers are reused once an item is gone; birth times and the bytes of the kernel's file handle, which include
+/// the inode's generation, are not. A file system has both, one of them, or neither.
 struct ItemIdentity {
     FileKind kind = FileKind::other;
-    std::uint64_t device = 0; // as numbered since the system started
+    std::uint64_t device = 0; // valid until the system restarts
     std::uint64_t inode = 0;
-    std::int64_t birthSeconds = 0; // since 1970; both parts zero: not known
+    std::int64_t birthSeconds = 0; // since 1970; unknown if both parts are zero
     std::uint32_t birthNanoseconds = 0;
     std::int32_t handleType = 0;
-    std::vector<std::byte> handle; // empty: not known
+    std::vector<std::byte> handle; // empty if unknown
 
     bool hasBirthTime() const { return birthSeconds != 0 || birthNanoseconds != 0; }
 };
 
-/// Of the item at a path, a symbolic link being an item; null, with errno, when there is none.
+/// The identity of the item at a path, which may be a symbolic link; null, with errno, if there is none.
 std::optional<ItemIdentity> itemIdentity(const char* path);
 
-/// Whether something that both have is different.
+/// Whether a part that both have differs.
 bool contradict(const ItemIdentity& a, const ItemIdentity& b);
-/// Whether nothing is different and there is more than the inode number to show it.
+/// Whether nothing differs and more than the inode number agrees.
 bool provenSame(const ItemIdentity& a, const ItemIdentity& b);
 
-/// The number by which a file system knows itself again, also after a restart; 0 when it is not to be had.
+/// File-system id that survives a reboot; 0 if unavailable.
 std::uint64_t fileSystemIdentifier(const char* path);
 
 } // namespace platform

@@ -40,7 +40,7 @@ std::string joined(const std::string& folder, const char* name)
     return folder.ends_with('/') ? folder + name : folder + '/' + name;
 }
 
-/// A folder to look through. `device` is that of the folder from which the walk began; a beginning has none yet.
+/// A folder to search. `device` is that of the folder where the walk began; that folder itself has none yet.
 struct WaitingFolder {
     std::string path;
     std::optional<dev_t> device;
@@ -97,7 +97,7 @@ private:
         return std::nullopt;
     }
 
-    /// The look at the device comes before the folder is opened, because opening is what makes an automounter mount.
+    /// The device is checked before the folder is opened, because opening triggers an automounter.
     void addSubfolder(const std::string& parent, const dirent& entry, int parentDescriptor, dev_t device)
     {
         std::string path = joined(parent, entry.d_name);

@@ -1,4 +1,4 @@
-// The walk that finds an item again by its identity, after it was renamed or moved nearby.
+// Finds an item again by its identity after it was renamed or moved nearby.
 #pragma once
 
 #include "platform/posix/ItemIdentity.h"
@@ -12,9 +12,9 @@ namespace platform {
 
 enum class SearchDepth { folderOnly, withSubfolders };
 
-/// The path of the item that is proven to be `wanted`, null when it is not found. Looks through the entries of the
-/// folders, in order, then through those of their subfolders, level by level, `entryLimit` entries in all. Leaves the
-/// device of none of the folders, follows no symbolic link (the folders' own paths excepted), waits for no mount.
+/// The path of the item that is proven to be `wanted`; null if it is not found. Searches the folders in order, then
+/// their subfolders level by level, up to `entryLimit` entries in all. Stays on the devices of the folders, follows no
+/// symbolic link except in the folders' own paths, and waits for no mount.
 std::optional<std::string> findItem(const ItemIdentity& wanted, const std::vector<std::string>& folders,
                                     SearchDepth depth, std::size_t entryLimit);
 

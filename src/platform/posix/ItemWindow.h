@@ -1,4 +1,4 @@
-// Which bytes of which stripe file stand for an item, and what each of them means.
+// The bytes of a stripe file that stand for an item, and the meaning of each.
 #pragma once
 
 #include "platform/FileCoordination.h"
@@ -9,13 +9,13 @@
 namespace platform {
 
 inline constexpr int kStripeCount = 256;
-/// Processes that can present at a time.
+/// Processes that can present at the same time.
 inline constexpr int kSlotCount = 1 << 16;
 inline constexpr std::int64_t kTicketCount = 1 << 22;
 
-/// Offsets in a window, lowest first. What a writer looks for (whoever presents to writers, whoever waits) lies
-/// together, and so does what a reader looks for, so that one query answers each; and who presents to both has one
-/// byte to raise.
+/// Offsets in a window, in ascending order. The bytes that a writer looks for (presenters to writers, waiters) are
+/// adjacent, and so are those that a reader looks for, so that one query finds each. A presenter to both has a single
+/// byte.
 enum WindowOffset : std::int64_t {
     kDataByte = 0,              // exclusive: a writer has access; shared: readers have
     kQueueByte = 1,             // exclusive: a writer has its turn, and access or asks for it
@@ -32,14 +32,13 @@ static_assert(kWriterPresence + kSlotCount == kCommonPresence && kCommonPresence
 static_assert(kWriterTickets + kTicketCount == kReaderTickets);
 static_assert(kReaderTickets + kTicketCount == kReaderPresence && kReaderPresence + kSlotCount < kWindowSize);
 
-/// Of the presence of those who are asked by these; that of a slot lies its number behind.
+/// Offset of the presence bytes of presenters that these ask; add the slot's number.
 inline std::int64_t presenceOffset(AskedBy askedBy)
 {
     return askedBy == AskedBy::both ? kCommonPresence : askedBy == AskedBy::writers ? kWriterPresence : kReaderPresence;
 }
 
-/// Eight bits of the key choose the stripe and 38 the window in it. Items that share all 46 would merely wait for each
-/// other.
+/// Eight bits of the key select the stripe and 38 the window in it. Items that share all 46 merely wait for each other.
 struct ItemWindow {
     int stripe;
     std::int64_t base;
@@ -53,7 +52,7 @@ struct ItemWindow {
 
     ByteRange range(std::int64_t offset, std::int64_t length = 1) const { return {base + offset, length}; }
     ByteRange whole() const { return range(0, kWindowSize); }
-    /// What stands at an absolute offset of the stripe, counted from the window's start.
+    /// The offset in the window of an absolute offset of the stripe.
     std::int64_t offsetOf(std::int64_t position) const { return position - base; }
 };
 

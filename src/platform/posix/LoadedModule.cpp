@@ -7,7 +7,7 @@ namespace platform {
 
 namespace {
 
-/// The folder of the library, or of the program that it is linked into, with a slash; empty when it is not known.
+/// The folder of the library, or of the program that contains it, with a trailing slash; empty if it is unknown.
 std::string ownFolder()
 {
     Dl_info info;
@@ -22,7 +22,7 @@ std::string ownFolder()
 const void* loadModule(const char* file, const char* symbol)
 {
     const std::string folder = ownFolder();
-    if (folder.empty()) // what follows would be looked for in the system's folders
+    if (folder.empty()) // a bare name would be searched for in the system's folders
         return nullptr;
     void* library = dlopen((folder + "ktfiles/" + file).c_str(), RTLD_NOW | RTLD_LOCAL | RTLD_NODELETE);
     return library != nullptr ? dlsym(library, symbol) : nullptr;

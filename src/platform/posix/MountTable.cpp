@@ -11,7 +11,7 @@ namespace platform {
 
 namespace {
 
-/// Space, tab, newline and backslash stand as "\ooo".
+/// Replaces "\ooo", which stands for space, tab, newline and backslash.
 std::string withoutOctals(std::string_view text)
 {
     std::string plain;

@@ -10,13 +10,13 @@ namespace platform {
 
 struct Mount {
     std::uint64_t id = 0;
-    std::string folder; // where it is mounted
+    std::string folder; // mount point
     std::string fileSystem;
 };
 
-/// One line of /proc/self/mountinfo; null for anything else.
+/// Parses one line of /proc/self/mountinfo; null for anything else.
 std::optional<Mount> mountFromLine(std::string_view line);
-/// The mount that the item at a path lies on; null when it is not known.
+/// The mount of the item at a path; null if it is unknown.
 std::optional<Mount> mountOf(const char* path);
 
 } // namespace platform

@@ -21,8 +21,8 @@ namespace platform {
 
 namespace {
 
-/// The threads that wait for work. A forked child begins with an empty set: its threads did not come along. Work is
-/// handed to one of them, the one that parked last: what it has just done is still in the processor's caches.
+/// Idle threads. A forked child begins with none, since threads do not survive a fork. Work goes to the thread that
+/// parked last, whose data is still in the processor's caches.
 class BackgroundThreads {
 public:
     static BackgroundThreads& shared();
@@ -44,9 +44,9 @@ public:
 private:
     static constexpr std::chrono::seconds kIdleTime{1};
 
-    /// A thread's place to wait for work, shared with who gives it: the thread may end before that is done. A
-    /// semaphore, as a condition makes whoever wakes take a mutex, and calls the system once more when it gives that
-    /// back.
+    /// Where a thread waits for work. Shared with whoever gives the work, because the thread may end before giving is
+    /// done. A semaphore, because waking from a condition variable takes a mutex and costs another system call when
+    /// that is released.
     class Parked {
     public:
         Parked() { ::sem_init(&given_, 0, 0); }
@@ -59,7 +59,7 @@ private:
             work_ = std::move(work);
             ::sem_post(&given_);
         }
-        /// False when there was none for so long; a clock that is set meanwhile makes that shorter or longer.
+        /// False if no work came in that time, which a change of the system clock shortens or lengthens.
         bool waitFor(std::chrono::seconds length)
         {
             timespec end = {};
@@ -85,7 +85,7 @@ private:
 
     bool startThread(std::function<void()> work)
     {
-        // The host's signal handlers are the business of the host's threads.
+        // Signals of the host are handled by the host's threads.
         sigset_t all, before;
         sigfillset(&all);
         pthread_sigmask(SIG_SETMASK, &all, &before);
@@ -99,7 +99,7 @@ private:
         return started;
     }
 
-    /// False where there is no memory for it: then the thread ends.
+    /// False if there is no memory, which ends the thread.
     bool park(std::shared_ptr<Parked>& mine)
     {
         try {
@@ -118,7 +118,7 @@ private:
         std::shared_ptr<Parked> mine;
         for (;;) {
             work();
-            work = nullptr; // what it captured goes before the wait
+            work = nullptr; // destroys its captures before the wait
             if (!park(mine))
                 return;
             if (!mine->waitFor(kIdleTime)) {
@@ -126,7 +126,7 @@ private:
                 if (std::erase(parked_, mine) > 0)
                     return;
                 lock.unlock();
-                mine->wait(); // it was chosen in that moment
+                mine->wait(); // work was given in that moment
             }
             work = mine->take();
         }

@@ -27,7 +27,7 @@ Places findPlaces()
 {
     Places found;
     found.home = homeDirectory("").utf8();
-    const char* dataHome = std::getenv("XDG_DATA_HOME"); // the rules ignore one that is relative
+    const char* dataHome = std::getenv("XDG_DATA_HOME"); // the rules ignore a relative path
     found.dataHome = dataHome != nullptr && *dataHome == '/' ? dataHome : found.home + "/.local/share";
     found.executable = executablePath();
     found.user = ::getuid();
@@ -70,7 +70,7 @@ std::vector<std::string> libraryFolders()
 
 bool isInTrash(const String& path)
 {
-    // The links of the folder, not of the item: a link in the trash is there whatever it leads to.
+    // Resolves links of the folder but not of the item: a link in the trash is in the trash wherever it leads.
     const std::string_view text = path.utf8();
     if (text.empty())
         return false;

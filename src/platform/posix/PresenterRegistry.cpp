@@ -13,7 +13,7 @@ namespace platform {
 
 namespace {
 
-/// Agrees when the last presenter that was asked has answered.
+/// Agrees once the last presenter that was asked has answered.
 class Reply {
 public:
     explicit Reply(std::shared_ptr<Connection> connection) : connection_(std::move(connection)) {}
@@ -64,7 +64,7 @@ public:
         reply_.reset();
     }
 
-    const Connection* const connection; // to tell it by
+    const Connection* const connection; // identifies the answer
     const bool byWriter;
     const bool holdsQueue;
 
@@ -166,7 +166,7 @@ bool PresenterRegistry::owesQueue(const FilePresenter* presenter)
     return found != registrations_.end() && found->second->owedToQueue > 0;
 }
 
-/// Raises before it lowers.
+/// Raises the new presence before it lowers the old one, so that the presenter is asked throughout.
 void PresenterRegistry::change(Registration& registration, AskedBy askedBy, std::vector<std::unique_ptr<Home>>& retired)
 {
     if (askedBy == registration.askedBy)
@@ -178,6 +178,21 @@ void PresenterRegistry::change(Registration& registration, AskedBy askedBy, std:
     registration.askedBy = askedBy;
 }
 
+/// Makes others ask for an item by raising its presence byte. Nothing is on disk but empty files; what others see is
+/// held by locks and a socket of this process, which the kernel takes back when it dies. Called with the mutex held, in
+/// this order:
+///
+/// 1. moveHome: a slot, its listening socket and the thread that answers. Nobody looks there yet. If the folder in
+/// force changed, everything that is raised already is raised in the new one before the old home retires, so that an
+/// item is never without its presence in both.
+/// 2. Home::raise: an exclusive lock on the presence byte. From here on whoever looks asks. The socket listened first,
+/// so an asker that sees the byte always reaches somebody.
+/// 3. A look whether the folder of the lock is still the one in force. If it was deleted in between, the lock is in a
+/// file that nobody opens any more, and all begins again in the new folder.
+///
+/// Only then is the presence counted. A process that dies after 1 leaves a socket at which nobody listens, which the
+/// next owner of the slot replaces; after 2 its byte falls with it, and askers that found nobody listening wait for
+/// just that. An exception leaves the byte down and the presence uncounted.
 void PresenterRegistry::raise(const SHA256Digest& key, AskedBy askedBy, std::vector<std::unique_ptr<Home>>& retired)
 {
     const auto presence = presences_.emplace(std::pair(key, askedBy), 0).first;
@@ -187,7 +202,7 @@ void PresenterRegistry::raise(const SHA256Digest& key, AskedBy askedBy, std::vec
                 moveHome(retired);
                 isRaised = homeNow_->raise(key, askedBy);
             } catch (const std::system_error& failure) {
-                if (failure.code().value() != ESTALE) // else there is another folder to move to
+                if (failure.code().value() != ESTALE) // on ESTALE there is another folder to move to
                     throw;
             }
     } catch (...) {
@@ -207,7 +222,8 @@ void PresenterRegistry::lower(const SHA256Digest& key, AskedBy askedBy)
     presences_.erase(presence);
 }
 
-/// To the folder in force, when that is another: everything that is raised is raised there first.
+/// Moves to the folder in force if it changed. Everything that is raised is raised there before the old folder is let
+/// go.
 void PresenterRegistry::moveHome(std::vector<std::unique_ptr<Home>>& retired)
 {
     while (!homeNow_ || homeNow_->server.directory() != CoordinationDirectory::current()) {
@@ -244,7 +260,7 @@ bool PresenterRegistry::Home::raise(const SHA256Digest& key, AskedBy askedBy)
     if (stripe == stripes.end())
         stripe = stripes.emplace(window.stripe, Stripe{directory.takeStripe(window.stripe), 0}).first;
     const ByteRange byte = window.range(presenceOffset(askedBy) + server.slot());
-    // The slot is ours, and so its byte, as soon as a killed predecessor's descriptors are all closed.
+    // The slot is ours, and so is its byte, as soon as all descriptors of a killed predecessor are closed.
     waitForLock(stripe->second.descriptor.get(), byte, LockKind::exclusive);
     if (!directory.stillThere(stripe->second.descriptor))
         return false;
@@ -265,7 +281,7 @@ void PresenterRegistry::Home::lower(const SHA256Digest& key, AskedBy askedBy)
     }
 }
 
-/// Calls the presenter for the request that has waited longest, unless it still owes the one before.
+/// Calls the presenter for the oldest waiting request, unless it still owes the answer to an earlier one.
 void PresenterRegistry::startNext(Registration& registration, bool byWriter, Answers& released)
 {
     Lane& lane = registration.lanes[byWriter];
@@ -283,7 +299,7 @@ void PresenterRegistry::startNext(Registration& registration, bool byWriter, Ans
             presenter->relinquishPresentedItemToReader(reacquirer);
     });
     if (!added)
-        return; // no thread: it stays first in line for the next request or answer
+        return; // no thread: it stays first in line until the next request or answer
     lane.busyWith = answer.get();
     lane.current = answer;
     lane.waiting.pop_front();
@@ -293,7 +309,7 @@ void PresenterRegistry::handle(const Request& request, const std::shared_ptr<Con
 {
     const bool byWriter = request.byWriter != 0;
     Answers released;
-    const auto reply = std::make_shared<Reply>(connection); // agrees at once when nobody here is to be asked
+    const auto reply = std::make_shared<Reply>(connection); // agrees at once if nobody here is to be asked
     const std::lock_guard lock(mutex_);
     for (const auto& [presenter, registration] : registrations_) {
         const bool isAsker = request.askerHome == home_ && request.asker == reinterpret_cast<std::uintptr_t>(presenter);

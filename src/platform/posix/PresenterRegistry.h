@@ -1,5 +1,5 @@
-// The presenters of this process: who they are, which of them others can see, what they were asked and have not
-// answered.
+// The presenters of this process: who they are, which of them others can see, and which questions they have not
+// answered yet.
 #pragma once
 
 #include "platform/FileCoordination.h"
@@ -15,35 +15,36 @@
 
 namespace platform {
 
-/// A presence byte is raised for an item while presenters here are to be asked, one for each kind of those that ask.
-/// The mutex is never held while the host's code runs.
+/// For each item, one presence byte is raised for each kind of asker while presenters here are to be asked. The mutex
+/// is never held while the host's code runs.
 class PresenterRegistry {
 public:
     static PresenterRegistry& shared();
     PresenterRegistry();
 
-    /// These throw std::system_error when the system refuses.
+    /// These throw std::system_error if the system refuses.
     void add(const std::shared_ptr<FilePresenter>& presenter, const SHA256Digest& key, AskedBy askedBy);
     void setAskedBy(const FilePresenter& presenter, AskedBy askedBy);
     void remove(const FilePresenter& presenter);
 
-    /// Takes what is raised along to the folder in force, when that is another.
+    /// Moves all that is raised to the folder in force, if that changed.
     void followFolder();
 
-    /// The number of this copy of the library, in which the addresses of its presenters mean something.
+    /// Identifies this copy of the library, within which the addresses of its presenters are meaningful.
     std::uint64_t home() const { return home_; }
-    /// The presence byte that stands for `own` and no other presenter, by its offset in the item's window, so that an
-    /// access of its own need not ask there; none when there is none.
+    /// The presence byte that stands for `own` alone, as an offset in the item's window, so that an access of `own`
+    /// need not ask there; none if there is no such byte.
     std::optional<std::int64_t> presenceOfOnly(const FilePresenter* own, const SHA256Digest& key,
                                                const CoordinationDirectory& directory);
-    /// Whether the presenter owes an answer to a writer that keeps the queue until it has it.
+    /// Whether the presenter owes an answer to a writer that holds the queue.
     bool owesQueue(const FilePresenter* presenter);
 
 private:
     class Answer;
-    /// Answers that may be dropped, and so given, only without the mutex, which that takes: declared before the lock.
+    /// Answers to drop, which gives them. Giving takes the mutex, so this is declared before the lock.
     using Answers = std::vector<std::shared_ptr<Answer>>;
-    struct Lane { // requests of one kind to one presenter
+    // Requests of one kind to one presenter.
+    struct Lane {
         std::deque<std::shared_ptr<Answer>> waiting;
         std::weak_ptr<Answer> current;
         const Answer* busyWith = nullptr;
@@ -60,7 +61,8 @@ private:
         Descriptor descriptor;
         int raised = 0;
     };
-    struct Home { // where others find this process
+    // Where others find this process.
+    struct Home {
         std::map<int, Stripe> stripes;
         RequestServer server;
 
@@ -69,7 +71,7 @@ private:
         bool raise(const SHA256Digest& key, AskedBy askedBy); // false when the folder was deleted
         void lower(const SHA256Digest& key, AskedBy askedBy);
     };
-    using Presences = std::map<std::pair<SHA256Digest, AskedBy>, int>; // presenters whom these ask
+    using Presences = std::map<std::pair<SHA256Digest, AskedBy>, int>; // number of presenters
 
     void change(Registration& registration, AskedBy askedBy, std::vector<std::unique_ptr<Home>>& retired);
     void raise(const SHA256Digest& key, AskedBy askedBy, std::vector<std::unique_ptr<Home>>& retired);

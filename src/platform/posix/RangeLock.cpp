@@ -24,7 +24,7 @@ struct flock requestFor(ByteRange range, int type)
     return request;
 }
 
-/// False when the lock is taken.
+/// False if the lock is taken by another.
 bool call(int descriptor, int command, struct flock& request)
 {
     for (;;) {
@@ -71,7 +71,7 @@ void unlock(int descriptor, ByteRange range)
 
 std::optional<ByteRange> findExclusiveLock(int descriptor, ByteRange range)
 {
-    struct flock request = requestFor(range, F_RDLCK); // what only an exclusive lock is in the way of
+    struct flock request = requestFor(range, F_RDLCK); // conflicts with exclusive locks only
     call(descriptor, F_OFD_GETLK, request);
     if (request.l_type == F_UNLCK)
         return std::nullopt;

@@ -1,5 +1,5 @@
-// Locks on ranges of bytes, owned by an open file description: the kernel drops them when its last descriptor is
-// closed, which it does itself for a process that is killed. The bytes need not exist.
+// Locks on byte ranges that belong to an open file description. The kernel drops them when its last descriptor is
+// closed, also for a process that is killed. The bytes need not exist.
 #pragma once
 
 #include <cstdint>
@@ -16,16 +16,16 @@ struct ByteRange {
 
 enum class LockKind { shared, exclusive };
 
-/// Takes the whole range or nothing; false when another description's lock is in the way. Interrupting signals do not
-/// show. Throws std::system_error for any other failure (ENOLCK: the kernel has no memory for locks), as the others do.
+/// Locks the whole range or nothing; false if another description's lock is in the way. Retries after signals. Throws
+/// std::system_error for any other failure, as the others do (ENOLCK: the kernel has no memory for locks).
 bool tryLock(int descriptor, ByteRange range, LockKind kind);
-/// Waits until the whole range is had.
+/// Waits until the whole range is locked.
 void waitForLock(int descriptor, ByteRange range, LockKind kind);
 void unlock(int descriptor, ByteRange range);
-/// Some exclusive lock of another description in the range, not always the first; none when there is none.
+/// Some exclusive lock of another description in the range, not necessarily the first; none if there is none.
 std::optional<ByteRange> findExclusiveLock(int descriptor, ByteRange range);
 
-/// The system's call behind all of these: fcntl with a `struct flock`. Only tests assign to it.
+/// The system call behind all of these: fcntl with a `struct flock`. Only tests assign to it.
 using LockCall = int (*)(int descriptor, int command, void* lock);
 LockCall& lockCall();
 

@@ -51,7 +51,7 @@ Questions::Asked Questions::ask(int slot, const Request& request)
     const SocketAddress address(directory_.socketPath(slot));
     int result = 0;
     do
-        result = ::connect(socket.get(), address.get(), address.size()); // waits only for room in the listener's line
+        result = ::connect(socket.get(), address.get(), address.size()); // waits only for room in the backlog
     while (result != 0 && errno == EINTR);
     if (result != 0) {
         if (errno == ECONNREFUSED || errno == ENOENT || errno == ECONNRESET)
@@ -63,12 +63,12 @@ Questions::Asked Questions::ask(int slot, const Request& request)
         sent = ::send(socket.get(), &request, sizeof request, MSG_NOSIGNAL);
     while (sent < 0 && errno == EINTR);
     if (sent != static_cast<ssize_t>(sizeof request))
-        return Asked::nobodyThere; // it ended since
+        return Asked::nobodyThere; // the process ended meanwhile
     open_.push_back({slot, std::move(socket)});
     return Asked::yes;
 }
 
-/// What has come: an answer, or the end of the connection.
+/// Takes an answer or the end of the connection.
 void Questions::take(Open& answered)
 {
     char answer = 0;
@@ -81,7 +81,7 @@ void Questions::take(Open& answered)
     spent_.push_back(std::move(answered.socket));
 }
 
-/// One after the other, as each of them is needed: the call that waits is the one that takes the answer.
+/// Waits for one after another, since all are needed; the call that waits also receives the answer.
 void Questions::wait()
 {
     for (Open& one : open_)

@@ -1,4 +1,4 @@
-// How an access asks the processes that present an item: one connection per question, one message each way.
+// How an access asks the processes that present an item: a connection per question, a message each way.
 #pragma once
 
 #include "platform/SecureHash.h"
@@ -12,31 +12,31 @@
 
 namespace platform {
 
-/// A question, as it travels between processes on one machine.
+/// A question as it travels between processes of one machine.
 struct Request {
     std::uint32_t magic = kMagic;
     std::uint8_t byWriter = 0;   // 1: relinquish to a writer, 0: to a reader
-    std::uint8_t holdsQueue = 0; // 1: the writer keeps the item's queue until it is answered
+    std::uint8_t holdsQueue = 0; // 1: the writer holds the item's queue until it is answered
     std::uint16_t reserved = 0;
-    std::uint64_t asker = 0;     // the address of the asker's own presenter, which is not asked, or 0 …
-    std::uint64_t askerHome = 0; // … and the number of the copy of the library in which that address means something
+    std::uint64_t asker = 0;     // address of the asker's own presenter, which is not asked, or 0 …
+    std::uint64_t askerHome = 0; // … and the copy of the library in which that address is valid
     SHA256Digest key{};
 
     static constexpr std::uint32_t kMagic = 0x4B544631;
 };
 static_assert(sizeof(Request) == 56);
 
-/// The presenting end of a connection. The answer is sent when the object that stands for it goes.
+/// The presenting end of a connection; the registry answers through it once its presenters have.
 class Connection {
 public:
     explicit Connection(Descriptor socket) : socket_(std::move(socket)) {}
 
-    /// Answers, and ends the connection: from here on the asker can go without waking anybody.
+    /// Answers and ends the connection, so that the asker can leave without waking anybody.
     void agree();
     void close();
     bool isOpen() const;
     enum class Heard { request, nothing, end };
-    /// What has come, without waiting; a message that is none of ours is an end.
+    /// Reads what has arrived, without waiting; an unknown message counts as an end.
     Heard receive(Request& request) const;
 
 private:
@@ -44,22 +44,22 @@ private:
     Descriptor socket_;
 };
 
-/// The asking end: questions that are out at the same time.
+/// The asking end: several questions at a time.
 class Questions {
 public:
     enum class Asked { yes, nobodyThere };
 
-    /// What has been answered goes to `spent`, as closing a socket takes longer than all that is left to do then.
+    /// Answered sockets go to `spent`, because closing one takes longer than everything else that is left to do then.
     Questions(CoordinationDirectory& directory, std::vector<Descriptor>& spent) : directory_(directory), spent_(spent)
     {
     }
 
-    /// Throws std::system_error when there is no descriptor or memory for a socket.
+    /// Throws std::system_error if there is no descriptor or memory for a socket.
     Asked ask(int slot, const Request& request);
     bool empty() const { return open_.empty(); }
-    /// Waits until every question has its answer or the end of its connection.
+    /// Waits until every question has an answer or its connection ended.
     void wait();
-    /// The same; false when `limit` passed first.
+    /// As wait(); false if `limit` passes first.
     bool waitFor(std::chrono::milliseconds limit);
     /// The slots whose processes agreed.
     const std::vector<int>& agreed() const { return agreed_; }

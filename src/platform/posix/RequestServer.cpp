@@ -44,7 +44,7 @@ RequestServer::RequestServer(std::shared_ptr<CoordinationDirectory> directory, H
     if (!stop_ || !events_ || !watch(EPOLL_CTL_ADD, stop_.get(), kStopEvent) ||
         !watch(EPOLL_CTL_ADD, listener_.get(), kListenerEvent))
         fail("coordination event");
-    sigset_t all, before; // the host's signal handlers are the business of the host's threads
+    sigset_t all, before; // signals of the host are handled by the host's threads
     sigfillset(&all);
     pthread_sigmask(SIG_SETMASK, &all, &before);
     try {
@@ -86,13 +86,13 @@ void RequestServer::listen()
     if (!listener_)
         fail("coordination socket");
     const std::string path = directory_->socketPath(slot_);
-    ::unlink(path.c_str()); // whoever had the slot before was killed
+    ::unlink(path.c_str()); // left by a former owner of the slot, which was killed
     const SocketAddress address(path);
     if (::bind(listener_.get(), address.get(), address.size()) != 0 || ::listen(listener_.get(), SOMAXCONN) != 0)
         fail("coordination socket");
 }
 
-/// A descriptor that is closed is watched no more: none is ever copied.
+/// A closed descriptor needs no removal, because descriptors are never copied.
 bool RequestServer::watch(int operation, int descriptor, std::uint64_t name, bool isWanted)
 {
     epoll_event event = {};
@@ -121,7 +121,8 @@ void RequestServer::serve()
         if (!mayAccept)
             continue;
         std::erase_if(clients_, [](const auto& client) { return !client.second.connection->isOpen(); }); // answered
-        // Without descriptors clients wait in line: they must not take the end of a connection for an answer.
+        // Without descriptors clients wait in the backlog, because they must not take a closed connection for an
+        // answer.
         if (const bool could = std::exchange(canAccept, acceptClients()); could != canAccept)
             watch(EPOLL_CTL_MOD, listener_.get(), kListenerEvent, canAccept);
     }
@@ -140,7 +141,7 @@ bool RequestServer::acceptClients()
         if (!watch(EPOLL_CTL_ADD, socket.get(), name))
             return false;
         clients_.emplace(name, Client{std::make_shared<Connection>(std::move(socket)), false});
-        hear(name); // most have asked already
+        hear(name); // most have sent their question already
     }
 }
 

@@ -1,4 +1,4 @@
-// The thread of a process that presents: takes the questions of other accesses and hands them on.
+// The thread of a presenting process: receives the questions of other accesses and passes them on.
 #pragma once
 
 #include "platform/posix/RequestChannel.h"
@@ -9,18 +9,18 @@
 
 namespace platform {
 
-/// Has a slot, its socket and a thread for as long as it lives. The thread never runs the host's code.
+/// Owns a slot, its socket and a thread. The thread never runs the host's code.
 class RequestServer {
 public:
     struct Handlers {
-        /// A question to be answered through the connection, which stays open until the asker has gone.
+        /// A question to be answered through the connection, which stays open until the asker leaves.
         std::function<void(const Request&, const std::shared_ptr<Connection>&)> request;
-        /// The asker has gone; what it asked need not be asked any more.
+        /// The asker left, so its question is obsolete.
         std::function<void(const Connection&)> gone;
     };
 
-    /// Throws std::system_error when there is no slot, descriptor or thread. Nobody can see the slot before its socket
-    /// listens: presence is raised later, and by someone else.
+    /// Throws std::system_error if there is no slot, descriptor or thread. Nobody sees the slot before its socket
+    /// listens, because its owner raises presences later.
     RequestServer(std::shared_ptr<CoordinationDirectory> directory, Handlers handlers);
     /// Ends the thread and every connection.
     ~RequestServer();
@@ -40,7 +40,7 @@ private:
     void serve();
     bool acceptClients();
     void hear(std::uint64_t name);
-    bool takeRequest(Client& client); // false when it has gone
+    bool takeRequest(Client& client); // false if the client left
 
     std::shared_ptr<CoordinationDirectory> directory_;
     Handlers handlers_;
@@ -49,7 +49,7 @@ private:
     Descriptor listener_;
     Descriptor stop_;
     Descriptor events_;
-    std::map<std::uint64_t, Client> clients_; // of the thread, by the names of their events
+    std::map<std::uint64_t, Client> clients_; // by the names of their events; used by the thread only
     std::uint64_t lastName_ = kListenerEvent;
     std::thread thread_;
 };

@@ -38,7 +38,7 @@ bool writeContent(int descriptor, BytesView content)
 {
     const SystemCalls& calls = systemCalls();
     const auto length = static_cast<std::int64_t>(content.size());
-    // Not every file system can reserve; that the disk is full, every one knows.
+    // Not every file system can reserve space, but each reports a full disk.
     if (length > 0 && calls.preallocate(descriptor, 0, length) != 0 && (errno == ENOSPC || errno == EDQUOT))
         return false;
     std::size_t written = 0;

@@ -1,5 +1,4 @@
-// The address of a socket that lies in the file system. For implementation files only: it is made of a system
-// structure.
+// The address of a socket in the file system. For implementation files only, since it contains a system structure.
 #pragma once
 
 #include <string>

@@ -1,4 +1,4 @@
-// Platform strings over std::string. The file systems of this system take and give UTF-8 as it is, without normalising.
+// Platform strings over std::string. File systems here store UTF-8 as it is, without normalization.
 #include "platform/String.h"
 
 #include <cstdint>
@@ -16,8 +16,8 @@ constexpr bool isSurrogate(char32_t value)
     return value >= 0xD800 && value <= 0xDFFF;
 }
 
-/// Reads one scalar value at `at`, before `end`, and moves `at` behind it. False where the bytes are not well-formed
-/// (The Unicode Standard, table 3-7).
+/// Reads one scalar value at `at`, before `end`, and moves `at` past it. False if the bytes are not well-formed (The
+/// Unicode Standard, table 3-7).
 bool readScalar(const char*& at, const char* end, char32_t& scalar)
 {
     const auto lead = static_cast<unsigned char>(*at++);
@@ -39,7 +39,7 @@ bool readScalar(const char*& at, const char* end, char32_t& scalar)
     return scalar >= smallest[trailing] && scalar <= kLastScalar && !isSurrogate(scalar);
 }
 
-/// Moves `at` over the ASCII that it stands before, eight bytes at a time; stops at most seven bytes too early.
+/// Moves `at` past the ASCII that begins there, eight bytes at a time; may stop up to seven bytes early.
 void skipASCII(const char*& at, const char* end)
 {
     std::uint64_t eight;

@@ -16,7 +16,7 @@ namespace platform {
 
 namespace {
 
-/// Whether resolving leaves the text of an absolute path as it is, save for links.
+/// Whether an absolute path is unchanged by resolving, links aside.
 bool isNormal(std::string_view path)
 {
     while (!path.empty()) {
@@ -31,8 +31,8 @@ bool isNormal(std::string_view path)
 
 enum class Walked { found, missing, unknown };
 
-/// Looks for an item in one call, which fails at a link, where `realpath` takes a call for each component. What is
-/// found is looked for anew each time: a folder that was resolved before may have another name by now.
+/// Looks for an item in one call, which fails at a link, where `realpath` takes a call per component. Results are not
+/// cached, because a folder may be renamed at any time.
 Walked walkWithoutLinks(const char* path)
 {
     open_how how = {};
@@ -45,7 +45,7 @@ Walked walkWithoutLinks(const char* path)
     return Walked::found;
 }
 
-/// False when no such item exists.
+/// False if no such item exists.
 bool resolve(const char* path, std::string& resolved)
 {
     if (isNormal(path)) {
@@ -62,7 +62,7 @@ bool resolve(const char* path, std::string& resolved)
     return true;
 }
 
-/// Appends the components of `rest` to `path`, by their text alone.
+/// Appends the components of `rest` to `path` by their text alone.
 void appendComponents(std::string& path, std::string_view rest)
 {
     while (!rest.empty()) {
@@ -105,7 +105,7 @@ String resolvingSymbolicLinksInPath(const String& path)
         return path;
     std::string resolved;
     if (!resolve(whole.c_str(), resolved)) {
-        // Shorten the path until what is left exists; "/" always does. A link whose target is missing stays as it is.
+        // Shorten the path until the rest exists; "/" always does. A link without a target stays as it is.
         std::size_t end = whole.size();
         do
             end = whole.rfind('/', end - 1);
@@ -115,7 +115,7 @@ String resolvingSymbolicLinksInPath(const String& path)
         appendComponents(resolved, std::string_view(whole).substr(end));
     }
     String text = String::fromUTF8(resolved);
-    return text.isNull() ? path : text; // a link may lead into a folder whose name is no text
+    return text.isNull() ? path : text; // a link may lead into a folder whose name is not UTF-8
 }
 
 URLRef filePathURL(const URLRef& url)

@@ -24,7 +24,7 @@ namespace {
 enum class Waiting : bool { no, yes };
 enum class Links : bool { followed, refused };
 
-/// Without waiting, so that what turns out not to be a regular file does not hold the caller up.
+/// Opens without blocking, so that a FIFO or device does not hold up the caller.
 int openFlags(OpenFor access, Waiting waiting = Waiting::no)
 {
     return (access == OpenFor::reading ? O_RDONLY : O_RDWR) | O_CLOEXEC | O_NOCTTY |
@@ -92,7 +92,7 @@ bool isRegular(const FileStatus& status)
     return false;
 }
 
-/// Passes on the descriptor of a regular file with its status; closes any other.
+/// Passes on the descriptor of a regular file, with its status; closes any other.
 int regularFileOnly(int descriptor, FileStatus* status)
 {
     if (descriptor < 0)
@@ -109,9 +109,9 @@ int regularFileOnly(int descriptor, FileStatus* status)
     return -1;
 }
 
-/// Another process, a file server say, may hold a lease on a regular file. Such a file is waited for, as a plain open
-/// does: the kernel asks the holder to give the lease back, and takes it after a time. What lies at the path is held by
-/// a descriptor that opens nothing, so that nothing else can take its place meanwhile.
+/// Waits for a regular file on which another process, such as a file server, holds a lease, as a plain open does: the
+/// kernel asks the holder to return the lease, and revokes it after a time. A path-only descriptor holds the item
+/// meanwhile, so that nothing can take its place.
 int openLeasedFile(const char* path, OpenFor access, Links links)
 {
     const int item = regularFileOnly(openPath(path, O_PATH | O_CLOEXEC, links), nullptr);
@@ -119,7 +119,7 @@ int openLeasedFile(const char* path, OpenFor access, Links links)
         return -1;
     const std::string itself = "/proc/self/fd/" + std::to_string(item);
     int descriptor = ::open(itself.c_str(), openFlags(access, Waiting::yes));
-    if (descriptor < 0 && errno == ENOENT) // no /proc here
+    if (descriptor < 0 && errno == ENOENT) // /proc is not mounted
         descriptor = openPath(path, openFlags(access, Waiting::yes), links);
     const int reason = errno;
     ::close(item);
@@ -143,7 +143,7 @@ int openFile(const char* path, OpenFor access, FileStatus* status)
     return openRegularFile(path, access, Links::followed, status);
 }
 
-/// Whether the path ends as those of recordings and loops do, which are read by the hundred thousand.
+/// Whether the path has an extension of recordings and loops, which are read by the hundred thousand.
 bool endsLikeRecording(std::string_view path)
 {
     const std::string_view end = path.substr(path.size() - std::min<std::size_t>(path.size(), 5));
@@ -153,17 +153,17 @@ bool endsLikeRecording(std::string_view path)
     return false;
 }
 
-/// Whether merely opening what lies at the path could do something: to open a device, or to let go whoever waits to
-/// write into a FIFO, and take its reader away again. To look first costs an open for reading a quarter of its time, so
-/// that a FIFO is trusted not to be called a recording.
+/// Whether merely opening the item could have an effect: open a device, or release a process that waits to write into a
+/// FIFO and then take its reader away. Looking first costs a quarter of the time of opening for reading, so a FIFO is
+/// trusted not to be named like a recording.
 bool needsLookBeforeOpening(const char* path, OpenFor access)
 {
     return access != OpenFor::reading || path[0] != '/' || std::strstr(path, "/dev/") != nullptr ||
            !endsLikeRecording(path);
 }
 
-/// "/proc/self/fd/N" leads to the file that is open, not to a name that somebody else could have given away: whoever
-/// asks for it by that path means it.
+/// "/proc/self/fd/N" leads to the open file rather than to a name, which another process could have changed; a caller
+/// who uses that path means that file.
 bool isOwnDescriptor(const char* path)
 {
     constexpr std::string_view kFolder = "/proc/self/fd/";
@@ -181,7 +181,7 @@ int openFileWithoutLinks(const char* path, OpenFor access, FileStatus* status)
     }
     const int descriptor = openRegularFile(path, access, Links::refused, status);
     if (descriptor < 0 && errno == EPERM)
-        errno = ENOSYS; // what a container's filter of system calls answers
+        errno = ENOSYS; // the answer of a container's system call filter
     return descriptor;
 }
 
@@ -207,7 +207,8 @@ int syncFolder(const char* path)
 {
     const int descriptor = ::open(path, O_RDONLY | O_DIRECTORY | O_CLOEXEC);
     if (descriptor < 0)
-        return errno == EACCES ? 0 : -1; // a folder that may be written but not read cannot be committed by itself
+        // A folder that can be written but not read cannot be committed by itself.
+        return errno == EACCES ? 0 : -1;
     const int result = ::fsync(descriptor) == 0 || errno == EINVAL ? 0 : -1;
     const int reason = errno;
     ::close(descriptor);
@@ -226,7 +227,7 @@ int renameWithoutReplacing(const char* from, const char* to)
         return 0;
     if (errno != EINVAL && errno != ENOSYS)
         return -1;
-    // A file system without that flag: a look ahead leaves a moment in which another process can take the name.
+    // On a file system without that flag, another process can take the name between the check and the rename.
     struct stat found = {};
     if (::lstat(to, &found) == 0)
         errno = EEXIST;
@@ -278,7 +279,7 @@ int renameInWithoutReplacing(int folder, const char* from, const char* to)
 {
     if (::renameat2(folder, from, folder, to, RENAME_NOREPLACE) == 0)
         return 0;
-    // A file system without that flag: a second name, then the first goes.
+    // On a file system without that flag, the file gets a second name and loses the first.
     if (errno == EEXIST || ::linkat(folder, from, folder, to, 0) != 0)
         return -1;
     ::unlinkat(folder, from, 0);
@@ -304,7 +305,7 @@ bool nextData(int descriptor, std::int64_t offset, std::int64_t* begin, std::int
     const off_t data = ::lseek(descriptor, offset, SEEK_DATA);
     if (data < 0 && errno == ENXIO)
         return false;
-    *begin = data < 0 ? offset : data; // a file system that knows no holes
+    *begin = data < 0 ? offset : data; // the file system does not report holes
     const off_t hole = data < 0 ? -1 : ::lseek(descriptor, data, SEEK_HOLE);
     *end = hole < 0 ? status.st_size : std::min(hole, status.st_size);
     return true;

@@ -1,5 +1,6 @@
-// Text encodings, decoded here: iconv's modules may be missing at run time, and glibc's for the Western encoding
-// differs from the published table in 0xC6 and 0xF0, so that a file's name would depend on what is installed.
+// Text encodings, decoded here because iconv's modules may be missing at run time, and because glibc's module for the
+// Western encoding differs from the published table in 0xC6 and 0xF0: a file's name must not depend on what is
+// installed.
 #include "platform/TextEncoding.h"
 
 #include "platform/core/Packed.h"
@@ -42,7 +43,7 @@ String decodeUnicode16(std::string_view bytes)
     return String::fromUTF16(units);
 }
 
-/// The bytes before the first 16-bit unit that is zero.
+/// The bytes before the first 16-bit zero.
 std::string_view bytesBeforeZeroUnit(const char* text)
 {
     std::size_t size = 0;

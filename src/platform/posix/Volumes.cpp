@@ -66,7 +66,7 @@ std::optional<VolumeSpace> volumeSpace(const char* path)
 {
     const auto status = volumeStatus(path);
     VolumeSpace space;
-    // Some virtual file systems claim more than can be counted.
+    // Some virtual file systems claim more space than 64 bits can count.
     if (!status || __builtin_mul_overflow(status->f_bavail, status->f_frsize, &space.free) ||
         __builtin_mul_overflow(status->f_blocks, status->f_frsize, &space.total))
         return std::nullopt;

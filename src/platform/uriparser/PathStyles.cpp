@@ -32,7 +32,7 @@ std::vector<std::string_view> components(std::string_view text, char separator)
     return found;
 }
 
-/// The character that a colon path has for one of a POSIX name, and the other way round.
+/// Exchanges the characters that stand for each other in colon and POSIX names.
 char exchangedInName(char c)
 {
     return c == '/' ? ':' : c == ':' ? '/' : c;
@@ -99,7 +99,7 @@ std::optional<std::string> readColonPath(std::string_view text)
     for (const std::string_view name : names) {
         const std::string_view component = name.empty() ? ".." : name;
         depth += name.empty() ? -1 : 1;
-        if (name == "." || name == ".." || (isAbsolute && depth < 1)) // the volume itself counts as one
+        if (name == "." || name == ".." || (isAbsolute && depth < 1)) // the volume counts as one
             return std::nullopt;
         if (isAbsolute || !path.empty())
             path += '/';
@@ -129,7 +129,7 @@ std::optional<std::string> colonPath(std::string_view path)
     }
     if (isAbsolute && count == 0)
         return std::nullopt;
-    // What ends without a name, and a volume alone, keep a colon.
+    // A path that ends without a name, and a volume alone, keep their colon.
     if (text.empty() || text.ends_with(':') || (isAbsolute && count == 1))
         text += ':';
     return text;

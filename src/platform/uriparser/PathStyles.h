@@ -8,20 +8,20 @@
 namespace platform {
 
 struct HostPath {
-    std::string host; // in lower case; empty for a path on this system
+    std::string host; // lower case; empty for a path on this system
     std::string path; // POSIX style
 };
 
-/// A path as text in a style, read; null where the style's rules (URL.h) give none. Not empty, and without a NUL.
+/// Parses a path in that style; null if the style's rules (URL.h) give none. The text is not empty and contains no NUL.
 std::optional<HostPath> readWindowsPath(std::string_view text);
 std::optional<std::string> readColonPath(std::string_view text);
 
-/// A path as text in a style; null when that would be read as another path. Slashes in the path are single, and none
-/// is at its end but the root's.
+/// The path in that style; null if it would be read as another path. Slashes in the path are single, and only the root
+/// ends with one.
 std::optional<std::string> windowsPath(std::string_view host, std::string_view path);
 std::optional<std::string> colonPath(std::string_view path);
 
-/// A host that URLs may name: letters, digits, "-", ".", "_" and "~".
+/// Whether a URL may name the host: letters, digits, "-", ".", "_" and "~".
 bool isHostName(std::string_view host);
 
 } // namespace platform

@@ -17,7 +17,7 @@ std::string_view textOfRange(const UriTextRangeA& range)
     return range.first == nullptr ? std::string_view() : std::string_view(range.first, range.afterLast);
 }
 
-/// Appends a path segment without its escapes; false when they hide a slash or a NUL.
+/// Appends a path segment without its escapes; false if they hide a slash or a NUL.
 bool appendUnescaped(std::string& path, std::string_view segment)
 {
     std::string text(segment);
@@ -84,7 +84,7 @@ std::optional<URIReference> parseURIReference(std::string_view text)
 
 std::string percentEncodedPath(const std::string& path)
 {
-    constexpr std::string_view prefix = "file://"; // which uriparser puts before an absolute path
+    constexpr std::string_view prefix = "file://"; // uriparser puts it before an absolute path
     std::string text(prefix.size() + 3 * path.size() + 1, '\0');
     uriUnixFilenameToUriStringA(path.c_str(), text.data());
     text.resize(text.find('\0'));

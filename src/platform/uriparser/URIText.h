@@ -7,7 +7,7 @@
 
 namespace platform {
 
-/// A URI reference taken apart.
+/// A URI reference, taken apart.
 struct URIReference {
     std::string scheme; // in lower case; empty for none
     bool hasAuthority = false;
@@ -15,17 +15,17 @@ struct URIReference {
     std::string host; // as in the text
     bool isAbsolutePath = false;
     bool endsInSlash = false;
-    std::optional<std::string> path; // decoded; null when its escapes hide a slash or a NUL, or are not UTF-8
-    std::string suffix;              // query and fragment with the marks before them
+    std::optional<std::string> path; // decoded; null if its escapes hide a slash or a NUL, or are not UTF-8
+    std::string suffix;              // query and fragment with their marks
 };
 
-/// Null when the text is no URI reference. Characters beyond ASCII count as escaped (RFC 3987).
+/// Null if the text is not a URI reference. Characters beyond ASCII count as escaped (RFC 3987).
 std::optional<URIReference> parseURIReference(std::string_view text);
 
 /// The text with every byte beyond ASCII percent-encoded.
 std::string withEscapesBeyondASCII(std::string_view text);
 
-/// A decoded path percent-encoded, component by component. Without a NUL.
+/// Percent-encodes a decoded path, component by component. The path contains no NUL.
 std::string percentEncodedPath(const std::string& path);
 
 } // namespace platform

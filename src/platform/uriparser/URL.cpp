@@ -12,11 +12,11 @@
 namespace platform {
 
 struct URL::Rest {
-    std::string otherText;        // the whole text of a URL of another scheme
-    bool hasAbsolutePath = false; // of that text
+    std::string otherText;        // the whole text, if the scheme is another
+    bool hasAbsolutePath = false; // whether otherText has one
     std::string host;             // in lower case; empty for this system
     std::string suffix;           // query and fragment
-    std::string relativePath;     // decoded; what stands in the text when there is a base
+    std::string relativePath;     // decoded; the path in the text of a URL with a base
     URLRef base;
 
     bool isEmpty() const { return otherText.empty() && host.empty() && suffix.empty() && !base; }
@@ -26,7 +26,7 @@ namespace {
 
 constexpr std::string_view kScheme = "file://";
 
-/// Slashes in a row made one, and none at the end but the root's.
+/// The path with runs of slashes made one, and no trailing slash except the root's.
 std::string withSingleSlashes(std::string_view path)
 {
     std::string result;
@@ -50,7 +50,7 @@ bool isDots(std::string_view component)
     return component == "." || component == "..";
 }
 
-/// An absolute path without "." and "..", which lead nowhere from the root.
+/// An absolute path without "." and ".."; ".." at the root stays there.
 std::string withoutDots(std::string_view path)
 {
     std::string result;
@@ -86,7 +86,7 @@ URL::URL(Creation, std::string path, bool isDirectory, std::unique_ptr<const Res
 
 URL::~URL() = default;
 
-/// `path` has single slashes; where it is relative and `rest` has a base, that is applied here.
+/// `path` has single slashes. If it is relative and `rest` has a base, the base is applied here.
 URLRef URL::create(std::string path, bool isDirectory, Rest rest)
 {
     isDirectory = isDirectory || path == "/" || isDots(lastComponent(path));
@@ -178,13 +178,13 @@ bool URL::isOfOtherScheme() const
     return path_.empty();
 }
 
-/// The path that stands in the text.
+/// The path that stands in the URL's text.
 const std::string& URL::ownPath() const
 {
     return rest_ && rest_->base ? rest_->relativePath : path_;
 }
 
-/// The text in which `path` is this URL's path.
+/// The text of this URL with `path` in place of its own.
 std::string URL::textOfPath(const std::string& path) const
 {
     if (isOfOtherScheme())
@@ -258,7 +258,7 @@ String URL::copyPathExtension() const
     return String::fromUTF8(name.substr(dot + 1));
 }
 
-/// Another item by way of the same base, or on the same host.
+/// A URL of another item with the same base, or on the same host.
 URLRef URL::withPath(std::string path, bool isDirectory) const
 {
     Rest rest;

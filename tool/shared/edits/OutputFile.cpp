@@ -112,6 +112,16 @@ void OutputFile::rewrite(std::int64_t offset, std::string_view bytes)
     }
 }
 
+/// Until here all bytes are in a temporary file beside the target. A signal that ends the process removes it; if the
+/// process is killed, the next output of the same name does. Now it is flushed and takes its name:
+///
+/// - A new name: by a rename, which replaces nothing unless that was asked for.
+/// - The name of a file: the new file gets its attributes and replaces it by a rename, so the name leads to the whole
+/// old content or to the whole new one.
+/// - The name of a file with further names, or with attributes that cannot be given to another: the content is written
+/// into that file. Only this way can leave half of it when the process dies; writeInto makes sure of the room first.
+///
+/// Last the folder is flushed, so that the name survives a power failure.
 void OutputFile::finish()
 {
     if (!file_)

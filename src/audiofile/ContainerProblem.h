@@ -5,6 +5,7 @@
 #include "platform/core/FourCC.h"
 
 #include <cstdint>
+#include <string>
 
 /// With the facts that a sentence about it needs. Tests true when there is one.
 struct [[nodiscard]] ContainerProblem {
@@ -44,4 +45,6 @@ struct [[nodiscard]] ContainerProblem {
     explicit operator bool() const { return kind != Kind::none; }
     /// As a status code (platform/core/Status.h), never 0 when there is a problem.
     KT_EXPORT std::int32_t Status() const;
+    /// In words, about the file: "is empty"; empty when there is none.
+    KT_EXPORT std::string Description() const;
 };

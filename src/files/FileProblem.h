@@ -44,4 +44,6 @@ struct [[nodiscard]] FileProblem {
     explicit operator bool() const { return kind != Kind::none; }
     /// As a status code (platform/core/Status.h), never 0 when there is a problem.
     KT_EXPORT std::int32_t Status() const;
+    /// In words, about the file: "became shorter while it was copied"; empty when there is none.
+    KT_EXPORT std::string Description() const;
 };

@@ -28,6 +28,7 @@ ARROWS = {
     "audiofile": {"files", "loops/tagging", "media/decoding", "platform"},
     "loops": {"audiofile", "audiofile/metadata", "files", "loops/tagging", "media/decoding", "platform"},
     "loops/overview": {"audiofile", "files", "media/samples", "platform"},
+    "loops/tags": {"loops"},
     "adm": {"platform"},
     "project": {"files", "platform"},
     "coordination": {"platform"},

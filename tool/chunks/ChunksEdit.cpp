@@ -36,7 +36,7 @@ Bytes readAll(const std::string& from)
     const int descriptor = standardInput ? STDIN_FILENO : opened.get();
     const std::string name = standardInput ? "standard input" : from;
     if (!standardInput && !opened)
-        throw Failure(name + ": " + systemErrorText(errno));
+        throw Failure(name + ": " + SystemErrorText(errno));
     constexpr std::size_t kStep = 1 << 20;
     Bytes bytes;
     std::size_t length = 0;
@@ -45,7 +45,7 @@ Bytes readAll(const std::string& from)
             bytes.resize(std::max(bytes.size() * 2, kStep));
         const ssize_t got = ::read(descriptor, bytes.data() + length, bytes.size() - length);
         if (got < 0 && errno != EINTR)
-            throw Failure(name + (errno == EISDIR ? " is a folder" : ": " + systemErrorText(errno)));
+            throw Failure(name + (errno == EISDIR ? " is a folder" : ": " + SystemErrorText(errno)));
         if (got == 0)
             break;
         length += static_cast<std::size_t>(std::max<ssize_t>(got, 0));

@@ -82,7 +82,7 @@ std::int64_t sizeOf(const std::string& path)
 {
     struct stat status = {};
     if (::stat(path.c_str(), &status) != 0)
-        throw Failure(systemErrorText(errno));
+        throw Failure(SystemErrorText(errno));
     return status.st_size;
 }
 
@@ -219,16 +219,16 @@ bool Sidecars::createMetadata(FourCC id, const Bytes& body)
         accessForWriting(metadata_, platform::FileCoordinator::WritingOptions::none, options_.waiting());
     struct stat sound = {};
     if (::stat(file_.c_str(), &sound) != 0)
-        throw Failure(systemErrorText(errno));
+        throw Failure(SystemErrorText(errno));
     removeTemporaryFilesAtEndingSignals();
     CTemporaryFile made;
     requireNone(made.Create(metadata_));
     makeMetadata(made.Path(), id, body);
     // Whoever may read the one may read the other; the owner where that can be had.
     if (::fchown(made.Descriptor(), sound.st_uid, sound.st_gid) != 0 && errno != EPERM)
-        throw Failure(systemErrorText(errno));
+        throw Failure(SystemErrorText(errno));
     if (::fchmod(made.Descriptor(), sound.st_mode & 0666) != 0)
-        throw Failure(systemErrorText(errno));
+        throw Failure(SystemErrorText(errno));
     requireNone(made.Commit());
     const FileProblem problem = made.Publish(metadata_);
     if (problem.kind == FileProblem::Kind::system && problem.systemError == EEXIST)
@@ -264,7 +264,7 @@ void Sidecars::removeRaw()
     const FileAccess access =
         accessForWriting(raw_, platform::FileCoordinator::WritingOptions::none, options_.waiting());
     if (::unlink(raw_.c_str()) != 0 && errno != ENOENT)
-        throw Failure(asGiven(raw_, given_) + ": " + systemErrorText(errno));
+        throw Failure(asGiven(raw_, given_) + ": " + SystemErrorText(errno));
     synchronizeFolderOf(raw_);
 }
 

@@ -2,9 +2,9 @@
 
 #include "audiofile/CAudioFileIO.h"
 #include "loops/tagging/CAFPayloads.h"
+#include "loops/tags/LoopTagFields.h"
 #include "platform/core/ByteWriter.h"
 #include "tool/shared/input/InputFile.h"
-#include "tool/shared/looptags/LoopTagFields.h"
 #include "tool/shared/portable/PortableMarkers.h"
 
 #include <fmt/format.h>
@@ -40,8 +40,8 @@ std::string nameOf(const HeldChunk& chunk)
 
 bool isTagText(std::string_view key)
 {
-    return std::ranges::any_of(tagFields(),
-                               [key](const TagField& field) { return field.isFileInfo && field.name == key; });
+    return std::ranges::any_of(loopTagFields(),
+                               [key](const LoopTagField& field) { return field.isFileInfo && field.name == key; });
 }
 
 void write(ByteWriter& out, const HeldChunk& chunk, FourCC fileType)

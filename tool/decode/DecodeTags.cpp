@@ -3,11 +3,13 @@
 #include "audiofile/CAudioFileIO.h"
 #include "loops/tagging/CAFPayloads.h"
 #include "loops/tagging/ChunkIDs.h"
+#include "loops/tags/LoopTagFields.h"
+#include "loops/tags/WaveLoopTags.h"
 #include "media/containers/ContainerHeaders.h"
 #include "media/containers/ContainerTraits.h"
+#include "tool/shared/input/FileLocation.h"
 #include "tool/shared/input/InputFile.h"
-#include "tool/shared/looptags/LoopTagFields.h"
-#include "tool/shared/looptags/WaveLoopTags.h"
+#include "tool/shared/looptags/LoopTagFiles.h"
 
 #include <fmt/format.h>
 
@@ -48,7 +50,7 @@ bool hasOtherTexts(const RawLoopTags& tags)
     bool hasOthers = false;
     if (const auto info = tags.texts.find(fourCC("info")); tags.fileType == kCaff && info != tags.texts.end())
         tagging::ForEachCAFInfoString(info->second, [&](std::string_view key, std::string_view) {
-            hasOthers = hasOthers || std::ranges::none_of(tagFields(), [&](const TagField& field) {
+            hasOthers = hasOthers || std::ranges::none_of(loopTagFields(), [&](const LoopTagField& field) {
                             return field.isFileInfo && field.name == key;
                         });
         });
@@ -57,15 +59,15 @@ bool hasOtherTexts(const RawLoopTags& tags)
 
 bool hasOtherUUIDs(const std::string& path)
 {
-    VireoLoopChunksManager manager = openLoopFile(path, platform::AudioFile::Permission::read);
+    auto manager = openLoopFile(fileLocation(path), platform::AudioFile::Permission::read);
     std::uint32_t count = 0;
-    if (manager.audioFileTypeID() != kCaff ||
-        manager.audioFile()->countUserData(tagging::kCAFUUIDChunk, count) != kStatusOK)
+    if (!manager || manager->audioFileTypeID() != kCaff ||
+        manager->audioFile()->countUserData(tagging::kCAFUUIDChunk, count) != kStatusOK)
         return false;
     for (std::uint32_t index = 0; index < count; ++index) {
         tagging::UUIDBytes uuid{};
         std::uint32_t size = sizeof uuid;
-        if (manager.audioFile()->userData(tagging::kCAFUUIDChunk, index, size, uuid) == kStatusOK &&
+        if (manager->audioFile()->userData(tagging::kCAFUUIDChunk, index, size, uuid) == kStatusOK &&
             cafChunkUUIDToChunkID(&uuid) == 0 && !UUIDIsEqual(uuid, tagging::kSilenceUUID))
             return true;
     }
@@ -108,7 +110,7 @@ void leaveTexts(LoopSource& source)
     source.tags.info.clear();
     source.bytes.texts.clear();
     source.tags.sampler.markers.clear();
-    std::erase(source.notKept, kMarkersAreLost);
+    std::erase(source.notKept, kLoopMarkersAreLost);
     if (!source.tags.isLoop()) { // a genre alone makes no loop
         source.tags.combined.erase(VireoLoopCombinedTagsChunkDataGenreKey);
         source.bytes.categories.reset();
@@ -126,7 +128,10 @@ DecodeTags::DecodeTags(const std::string& path)
 {
     bool holdsTags = true;
     try {
-        source_ = readLoopSource(path);
+        platform::Error error;
+        source_ = readLoopSource(fileLocation(path), &error);
+        if (source_ == nullptr)
+            failForTags(path, error);
     } catch (const OtherKind&) {
         holdsTags = false;
     } catch (const Failure& failure) { // no reason to go without the sound
@@ -199,12 +204,15 @@ CarriedTags DecodeTags::carryTo(const std::string& output, const std::string& co
     if (sound.sampleRate != sourceRate && sourceRate > 0)
         scaleTransients(sound.sampleRate / sourceRate);
     try {
-        const TagsPlan plan = planTagsCopy(source_, readOwnLoopTags(output), output);
-        if (!plan.changes.empty())
-            writeTags(output, plan);
-        for (const TagChange& change : plan.changes)
+        platform::Error error;
+        const auto plan = planLoopTagsCopy(source_, ownLoopTagsOf(output), fileLocation(output), &error);
+        if (!plan)
+            failForTags(output, error);
+        if (!plan->changes.empty())
+            writeTags(output, *plan);
+        for (const LoopTagChange& change : plan->changes)
             carried.keys.push_back(change.key);
-        carried.notKept.insert(carried.notKept.end(), plan.notKept.begin(), plan.notKept.end());
+        carried.notKept.insert(carried.notKept.end(), plan->notKept.begin(), plan->notKept.end());
     } catch (const Failure& failure) { // nor a reason to lose it
         carried.notKept.push_back(std::string("its tags are not carried over: ") + failure.what());
     }

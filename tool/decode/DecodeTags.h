@@ -1,8 +1,8 @@
 // The loop tags of a file that is decoded, and what else it holds beside the sound.
 #pragma once
 
+#include "loops/tags/LoopTagsCopy.h"
 #include "tool/decode/DecodeFormat.h"
-#include "tool/shared/looptags/LoopTagsCopy.h"
 
 #include <memory>
 #include <span>

@@ -111,5 +111,5 @@ void DecodeTargets::makeFolder(const std::filesystem::path& folder)
     if (::mkdir(folder.c_str(), 0777) == 0)
         made_.push_back(folder);
     else if (errno != EEXIST)
-        throw Failure("the folder " + folder.string() + ": " + systemErrorText(errno));
+        throw Failure("the folder " + folder.string() + ": " + SystemErrorText(errno));
 }

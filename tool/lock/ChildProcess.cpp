@@ -88,7 +88,7 @@ int runChild(const std::vector<std::string>& words)
     const HeldSignals signals;
     pid_t child = 0;
     if (const int error = spawn(words, signals.before(), child); error != 0) {
-        reportFailure(words.front(), systemErrorText(error));
+        reportFailure(words.front(), SystemErrorText(error));
         return error == ENOENT ? kExitNotFound : kExitCannotRun;
     }
     return awaitEnd(child, signals.held());

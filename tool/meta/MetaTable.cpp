@@ -55,14 +55,14 @@ std::string contentOf(const std::string& file)
 {
     const platform::OwnedDescriptor opened(::open(systemPath(file).c_str(), O_RDONLY | O_NOCTTY | O_CLOEXEC));
     if (!opened)
-        throw Failure(systemErrorText(errno));
+        throw Failure(SystemErrorText(errno));
     constexpr std::size_t step = 1 << 20;
     std::string text;
     for (std::size_t size = 0;;) {
         text.resize(size + step);
         const ssize_t got = ::read(opened.get(), text.data() + size, step);
         if (got < 0 && errno != EINTR)
-            throw Failure(errno == EISDIR ? "is a folder, not a table" : systemErrorText(errno));
+            throw Failure(errno == EISDIR ? "is a folder, not a table" : SystemErrorText(errno));
         size += static_cast<std::size_t>(std::max<ssize_t>(got, 0));
         text.resize(size);
         if (got == 0)

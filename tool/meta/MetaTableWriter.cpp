@@ -12,7 +12,7 @@ namespace {
 
 [[noreturn]] void failToKeep()
 {
-    throw Failure("the rows cannot be kept in a temporary file: " + systemErrorText(errno));
+    throw Failure("the rows cannot be kept in a temporary file: " + SystemErrorText(errno));
 }
 
 enum class InXML { attribute, content };

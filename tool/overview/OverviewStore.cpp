@@ -57,7 +57,7 @@ void write(const std::string& path, FileOverview& overview, bool kept)
     bool stored = false;
     const std::int32_t status = WriteOverviewToAudioFile(referenceTo(path), &overview.block(), 0, &stored);
     if (status != kStatusOK)
-        throw Failure(errno != 0 ? systemErrorText(errno)
+        throw Failure(errno != 0 ? SystemErrorText(errno)
                                  : std::string("its overview cannot be stored: ") + StatusText(status));
     const std::unique_ptr<KTMem> found = storedIn(path);
     if (kept ? !stored || !found || !areEqual(*found, overview.block()) : found != nullptr)

@@ -25,7 +25,7 @@ constexpr const char* kBackedUp[] = {"ProjectData", "MetaData.plist", "ARA Files
 
 [[noreturn]] void failWithErrno()
 {
-    throw Failure(systemErrorText(errno));
+    throw Failure(SystemErrorText(errno));
 }
 
 void requireNoEnd()
@@ -151,10 +151,10 @@ std::string makeBackup(const ProjectInformation& project, long alternative, int 
         copyAlternative(*folder, unfinished.path(), quiet);
         backup = publish(unfinished, package, alternative, keep);
     } catch (const fs::filesystem_error& error) {
-        throw Failure(systemErrorText(error.code().value()));
+        throw Failure(SystemErrorText(error.code().value()));
     }
     if (keep > 0 && !ProjectInformation::purgeBackupsForBundleURL(package, alternative, keep, backup))
         throw Failure(fmt::format("backup {} was made, but not all old ones can be deleted: {}", backupName(backup),
-                                  systemErrorText(errno)));
+                                  SystemErrorText(errno)));
     return backupName(backup);
 }

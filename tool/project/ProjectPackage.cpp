@@ -14,7 +14,7 @@ std::string resolvedFolder(const std::string& path)
     const std::unique_ptr<char, decltype(&std::free)> resolved(::realpath(path.c_str(), nullptr), &std::free);
     struct stat status = {};
     if (!resolved || ::stat(resolved.get(), &status) != 0)
-        throw Failure(systemErrorText(errno));
+        throw Failure(SystemErrorText(errno));
     if (!S_ISDIR(status.st_mode))
         throw Failure("is no folder");
     return resolved.get();

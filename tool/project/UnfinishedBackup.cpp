@@ -43,7 +43,7 @@ UnfinishedBackup::UnfinishedBackup(const fs::path& backups)
     std::error_code error;
     fs::create_directories(backups, error);
     if (error)
-        throw Failure(systemErrorText(error.value()));
+        throw Failure(SystemErrorText(error.value()));
     removeAbandoned(backups);
     std::random_device random;
     for (int attempt = 0; attempt < kMostAttempts; ++attempt) {
@@ -51,7 +51,7 @@ UnfinishedBackup::UnfinishedBackup(const fs::path& backups)
         if (::mkdir(path.c_str(), 0777) != 0) {
             if (errno == EEXIST)
                 continue;
-            throw Failure(systemErrorText(errno));
+            throw Failure(SystemErrorText(errno));
         }
         lock_ = lockedFolder(path);
         struct stat status = {};
@@ -76,7 +76,7 @@ bool UnfinishedBackup::publish(const fs::path& name)
     if (::rename(path_.c_str(), name.c_str()) != 0) {
         if (errno == EEXIST || errno == ENOTEMPTY || errno == ENOTDIR)
             return false;
-        throw Failure(systemErrorText(errno));
+        throw Failure(SystemErrorText(errno));
     }
     path_.clear();
     synchronizeFolderOf(name.string());

@@ -3,7 +3,6 @@
 #include "tool/shared/arguments/CommandLine.h"
 #include "tool/shared/arguments/ThreadsOption.h"
 #include "tool/shared/input/FolderWalk.h"
-#include "tool/shared/looptags/LoopTags.h"
 #include "tool/shared/output/Failure.h"
 #include "tool/shared/output/FilesProgress.h"
 #include "tool/shared/output/ProgressLine.h"

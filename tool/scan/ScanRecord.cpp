@@ -1,5 +1,7 @@
 #include "tool/scan/ScanRecord.h"
 
+#include "tool/shared/looptags/LoopTagFiles.h"
+#include "tool/shared/looptags/LoopTagWords.h"
 #include "tool/shared/looptags/LoopTagsCsv.h"
 #include "tool/shared/output/Failure.h"
 #include "tool/shared/output/ShownName.h"
@@ -70,7 +72,7 @@ ScanRecord scanFile(const FoundFile& item, Form form)
         return record;
     }
     try {
-        if (const LoopTags tags = readLoopTags(item.path); tags.isLoop())
+        if (const LoopTags tags = loopTagsOf(item.path); tags.isLoop())
             fill(record, item.path, tags, form);
     } catch (const OtherKind& other) {
         if (!other.isAudio() && isCalledLoop(item.path))

@@ -4,7 +4,8 @@
 #include "tool/shared/arguments/CommandLine.h"
 #include "tool/shared/arguments/ThreadsOption.h"
 #include "tool/shared/input/FileByFile.h"
-#include "tool/shared/looptags/LoopTags.h"
+#include "tool/shared/looptags/LoopTagFiles.h"
+#include "tool/shared/looptags/LoopTagWords.h"
 #include "tool/shared/looptags/LoopTagsCsv.h"
 #include "tool/shared/output/DataRecords.h"
 #include "tool/shared/output/DisplayWidth.h"
@@ -78,7 +79,7 @@ bool runTags(const FileArguments& files, unsigned threads, const OutputOptions& 
     const FileLoop loop{.threads = threads, .quiet = options.quiet};
     return writeFileByFile(writer, files, loop, [&](const FoundFile& file) {
         const FileAccess access = accessForReading(file.path, {.quiet = options.quiet});
-        return readLoopTags(file.path);
+        return loopTagsOf(file.path);
     });
 }
 

@@ -1,8 +1,10 @@
 // ktfiles tags copy: every kind of loop chunk from one file to others, AIFF and CAF in either direction.
+#include "loops/tags/LoopTagsCopy.h"
 #include "tool/shared/access/FileAccess.h"
 #include "tool/shared/arguments/CommandLine.h"
-#include "tool/shared/looptags/LoopTagsCopy.h"
-#include "tool/shared/output/Failure.h"
+#include "tool/shared/input/FileLocation.h"
+#include "tool/shared/looptags/LoopTagFiles.h"
+#include "tool/shared/looptags/LoopTagsEdit.h"
 #include "tool/tags/TagsCommand.h"
 
 namespace {
@@ -18,13 +20,17 @@ bool runCopy(const CopyArguments& arguments, const OutputOptions& output)
     std::shared_ptr<const LoopSource> source;
     if (!reportingFailures(arguments.from, [&] {
             const FileAccess access = accessForReading(arguments.from, arguments.options.waiting());
-            source = readLoopSource(arguments.from);
+            platform::Error error;
+            source = readLoopSource(fileLocation(arguments.from), &error);
+            if (source == nullptr)
+                failForTags(arguments.from, error);
             if (source->isEmpty())
                 throw Failure("has no loop tags");
         }))
         return false;
-    const TagsEditor editor{"copy", "copied", "would copy", [&](const LoopTags& before, const std::string& target) {
-                                return planTagsCopy(source, before, target);
+    const TagsEditor editor{"copy", "copied", "would copy",
+                            [&](const LoopTags& before, const platform::URLRef& target, platform::Error* error) {
+                                return planLoopTagsCopy(source, before, target, error);
                             }};
     return editTags(arguments.to, editor, arguments.options, output);
 }

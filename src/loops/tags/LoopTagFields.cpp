@@ -1,4 +1,4 @@
-#include "tool/shared/looptags/LoopTagFields.h"
+#include "loops/tags/LoopTagFields.h"
 
 #include "loops/VireoLoopChunks.h"
 #include "loops/VireoLoopTerms.h"
@@ -8,14 +8,14 @@
 #include <iterator>
 #include <limits>
 
-using Kind = TagField::Kind;
-
 namespace {
+
+using Kind = LoopTagField::Kind;
 
 constexpr std::int64_t kMost16 = std::numeric_limits<std::int16_t>::max();
 constexpr std::int64_t kMost32 = std::numeric_limits<std::int32_t>::max();
 
-constexpr TagField kFields[] = {
+constexpr LoopTagField kFields[] = {
     {"beatCount", "beats", VireoLoopCombinedTagsChunkDataBeatCountKey, Kind::number, false, 0, kMost32},
     {"midiRootNote", "rootNote", VireoLoopCombinedTagsChunkDataMidiRootNoteKey, Kind::number, false, 0, 127},
     {"keyType", "mode", VireoLoopCombinedTagsChunkDataKeyType, Kind::number, false, 0, 4},
@@ -47,12 +47,12 @@ bool isSameName(std::string_view a, std::string_view b)
 
 } // namespace
 
-std::span<const TagField> tagFields()
+std::span<const LoopTagField> loopTagFields()
 {
     return kFields;
 }
 
-std::vector<const TagField*> fieldsForKey(std::string_view key)
+std::vector<const LoopTagField*> loopTagFieldsForKey(std::string_view key)
 {
     std::vector<std::string_view> names{key};
     if (isSameName(key, "key"))
@@ -61,8 +61,8 @@ std::vector<const TagField*> fieldsForKey(std::string_view key)
         names = {"keyType"};
     else if (isSameName(key, "signature"))
         names = {"signatureTop", "signatureBottom"};
-    std::vector<const TagField*> fields;
-    for (const TagField& field : kFields)
+    std::vector<const LoopTagField*> fields;
+    for (const LoopTagField& field : kFields)
         if (std::ranges::any_of(names, [&](std::string_view name) {
                 return isSameName(name, field.name) || isSameName(name, field.word);
             }))
@@ -70,25 +70,13 @@ std::vector<const TagField*> fieldsForKey(std::string_view key)
     return fields;
 }
 
-std::string noteName(std::int64_t note)
-{
-    const std::string_view name = VireoLoopNoteName(note);
-    return name.empty() ? std::to_string(note) : std::string(name);
-}
-
-std::string keyName(std::int64_t note)
+std::string loopKeyName(std::int64_t note)
 {
     constexpr std::int64_t octave = 12, lowestNamed = 48;
     return note < 1 || note > 127 ? "" : std::string(VireoLoopNoteName(lowestNamed + note % octave));
 }
 
-std::string modeName(std::int64_t keyType)
-{
-    const std::string_view name = VireoLoopModeName(keyType);
-    return name.empty() ? std::to_string(keyType) : std::string(name);
-}
-
-std::string carriedChunkName(const VireoLoopBaseChunk& chunk)
+std::string carriedLoopChunkName(const VireoLoopBaseChunk& chunk)
 {
     return chunk.aifChunkID() != 0 ? fourCCText(chunk.aifChunkID()) : "silence";
 }

@@ -1,5 +1,7 @@
-// The vocabulary of loop tags: their names, and those of notes and modes.
+// The vocabulary of loop tags: their names, and those of keys.
 #pragma once
+
+#include "platform/core/Export.h"
 
 #include <cstdint>
 #include <span>
@@ -10,7 +12,7 @@
 class VireoLoopBaseChunk;
 
 /// One tag that can be set.
-struct TagField {
+struct LoopTagField {
     enum class Kind { number, text, list, transients };
 
     const char* name; // in JSON, in lines and on the command line
@@ -23,18 +25,14 @@ struct TagField {
 };
 
 /// All of them, in the order of output.
-std::span<const TagField> tagFields();
+KT_EXPORT std::span<const LoopTagField> loopTagFields();
 
 /// The fields that a name of the command line stands for: one, two for "signature" and for "key", which is a root note
 /// with its mode, none for an unknown one. Case does not count, nor do "-", "_" and spaces: labels of a table are
 /// names.
-std::vector<const TagField*> fieldsForKey(std::string_view key);
+KT_EXPORT std::vector<const LoopTagField*> loopTagFieldsForKey(std::string_view key);
 
-/// "C" to "B" for MIDI notes 48 to 59, the number for others.
-std::string noteName(std::int64_t note);
 /// "C" to "B" for MIDI notes of every octave, 1 to 127; empty for others.
-std::string keyName(std::int64_t note);
-/// "none", "minor", "major", "neither", "both"; the number for others.
-std::string modeName(std::int64_t keyType);
-/// The id by which people know a chunk that is carried without being interpreted.
-std::string carriedChunkName(const VireoLoopBaseChunk& chunk);
+KT_EXPORT std::string loopKeyName(std::int64_t note);
+/// The id by which people know a chunk that is carried without being interpreted; "silence" for the one that has none.
+KT_EXPORT std::string carriedLoopChunkName(const VireoLoopBaseChunk& chunk);

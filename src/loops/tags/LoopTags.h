@@ -1,22 +1,21 @@
-// The loop tags of one file, as the verbs show, compare and change them: of the loop chunks of AIFF and CAF files, and
-// of what the chunks of samplers say in WAVE and AIFF.
+// The loop tags of one file: what its loop chunks say, if it is AIFF or CAF, and what the chunks of samplers say in
+// WAVE and AIFF. LoopTagsEdit.h changes them.
 #pragma once
 
 #include "loops/SamplerTags.h"
 #include "loops/VireoLoopChunksManager.h"
+#include "platform/core/Error.h"
 #include "platform/core/Value.h"
-#include "tool/shared/output/Failure.h"
 
 #include <cstdint>
 #include <map>
+#include <optional>
 #include <string>
 #include <string_view>
 #include <vector>
 
-class JsonWriter;
-
 /// Plain values; nothing of the file stays open.
-struct LoopTags {
+struct KT_EXPORT LoopTags {
     /// A chunk that is carried without being interpreted. `size` is that of its body, without a UUID.
     struct Chunk {
         std::string id; // the AIFF id in either kind of file; "silence" for the chunk that has none
@@ -46,58 +45,44 @@ struct LoopTags {
     bool isEmpty() const { return combined.empty() && info.empty() && transients.empty() && chunks.empty(); }
 };
 
+/// Reads all that is known of a file as a loop, and of the chunks that are not interpreted only the sizes. None for a
+/// file that cannot be read, and for one of another kind (LoopTagsError.h).
+KT_EXPORT std::optional<LoopTags> readLoopTags(const platform::URLRef& file, platform::Error* error = nullptr);
+/// The same for edits: of AIFF and CAF files the loop chunks alone, of WAVE what its own chunks say.
+KT_EXPORT std::optional<LoopTags> readOwnLoopTags(const platform::URLRef& file, platform::Error* error = nullptr);
+/// What `sampler` says, where the tags say nothing yet.
+KT_EXPORT void addSamplerTags(LoopTags& tags, SamplerTags sampler);
+
 /// What openLoopFile takes.
 enum class LoopFiles { withLoopChunks, waveToo };
-/// Opens a file that can hold loop chunks, or WAVE where that is asked for; throws Failure, for another OtherKind.
-VireoLoopChunksManager openLoopFile(const std::string& path, platform::AudioFile::Permission permission,
-                                    LoopFiles kinds = LoopFiles::withLoopChunks);
-
-/// Reads all that is known of a file as a loop, and of the chunks that are not interpreted only the sizes. Throws
-/// Failure, for a file of another kind OtherKind.
-LoopTags readLoopTags(const std::string& path);
-/// The same for edits: of AIFF and CAF files the loop chunks alone, of WAVE what its own chunks say.
-LoopTags readOwnLoopTags(const std::string& path);
-/// What `sampler` says, where the tags say nothing yet.
-void addSamplerTags(LoopTags& tags, SamplerTags sampler);
-
+/// Opens a file that can hold loop chunks, or WAVE where that is asked for; none for another.
+KT_EXPORT std::optional<VireoLoopChunksManager> openLoopFile(const platform::URLRef& file,
+                                                             platform::AudioFile::Permission permission,
+                                                             LoopFiles kinds = LoopFiles::withLoopChunks,
+                                                             platform::Error* error = nullptr);
 /// The chunks of an open file that hold loop tags or are carried, whether they can be read or not.
-std::vector<LoopTags::Chunk> loopChunksOf(VireoLoopChunksManager& manager);
-
-/// One tag in words: its name, its label for people, and the value.
-struct TagLine {
-    const char* name;
-    const char* label;
-    std::string text;   // in one line, as `tags set` takes it back
-    std::string brief;  // for people
-    std::string source; // the chunk that says it, where that is none of the loop chunks
-};
-/// What is known of the tags, in a musician's order.
-std::vector<TagLine> tagLines(const LoopTags& tags);
-using TagText = std::string (*)(const LoopTags& tags);
-/// What gives the text of one tag, in one line, by its name, which must be one of theirs.
-TagText tagTextCalled(std::string_view name);
-
-/// The root note by its name, in whatever octave, and the mode.
-std::string keyWords(const LoopTags& tags);
+KT_EXPORT std::vector<LoopTags::Chunk> loopChunksOf(VireoLoopChunksManager& manager);
 
 /// "AIFF", "CAF", "WAVE".
-std::string loopContainerName(FourCC fileType);
+KT_EXPORT std::string loopContainerName(FourCC fileType);
+/// "4/4"; empty unless both parts are there.
+KT_EXPORT std::string loopSignature(const LoopTags& tags);
 
-/// A tag by the name that JSON has for it: a number, a text or a list.
-struct TagValue {
+/// A tag by its name (LoopTagFields.h): a number, a text or a list.
+struct LoopTagValue {
     std::string name;
     platform::Value value;
 };
-/// The value under a key; null when there is none.
-platform::Value valueUnder(const platform::Dictionary& values, const char* key);
 /// Null and zero, empty texts and empty lists are no tag.
-bool isAbsent(const platform::Value& value);
-/// All tags that are present, in the order of output; not the transients and the chunks.
-std::vector<TagValue> tagValues(const LoopTags& tags);
-/// The same as records have them: what is known of the sound first, and words beside the numbers that stand for them.
-std::vector<TagValue> tagRecord(const LoopTags& tags);
+KT_EXPORT bool isAbsentLoopTag(const platform::Value& value);
+/// All tags that are present, in the order of loopTagFields, then "tempo", which follows from others; not the
+/// transients and the chunks.
+KT_EXPORT std::vector<LoopTagValue> loopTagValues(const LoopTags& tags);
+/// The same with what is known of the sound first ("fileType", "containerName", "sampleRate", "frames",
+/// "durationSeconds"), and words behind the numbers that stand for them ("key", "mode", "signature").
+KT_EXPORT std::vector<LoopTagValue> loopTagRecord(const LoopTags& tags);
 /// Of all values the chunk that says them: where no sampler's chunk does, a loop chunk. By the AIFF ids in either kind
 /// of file, but for the texts of CAF, which stand in "info".
-std::map<std::string, std::string, std::less<>> sourcesOf(const LoopTags& tags);
-/// The whole JSON object, on one line.
-void writeLoopTags(JsonWriter& json, const std::string& path, const LoopTags& tags);
+KT_EXPORT std::map<std::string, std::string, std::less<>> loopTagSources(const LoopTags& tags);
+/// "forward", "alternating", "backward" or "other".
+KT_EXPORT const char* loopKindName(SamplerTags::Loop::Kind kind);

@@ -1,12 +1,9 @@
-#include "tool/shared/looptags/TagsCarrier.h"
+#include "loops/tags/LoopTagsCarrier.h"
 
 #include "loops/VireoLoopFileInfoChunkDataTypes.h"
+#include "loops/tags/LoopTagsLayouts.h"
 #include "media/containers/ContainerHeaders.h"
 #include "platform/String.h"
-#include "tool/shared/looptags/LoopTagsEdit.h"
-#include "tool/shared/output/Failure.h"
-
-#include <fmt/format.h>
 
 #include <algorithm>
 #include <limits>
@@ -30,8 +27,8 @@ bool isBlank(const std::string& text)
 
 } // namespace
 
-TagsCarrier::TagsCarrier(const LoopTags& tags, const RawLoopTags& from, RawLoopTags& to,
-                         std::vector<std::string>& notKept)
+LoopTagsCarrier::LoopTagsCarrier(const LoopTags& tags, const RawLoopTags& from, RawLoopTags& to,
+                                 std::vector<std::string>& notKept)
     : tags_(tags),
       from_(from),
       to_(to),
@@ -40,33 +37,33 @@ TagsCarrier::TagsCarrier(const LoopTags& tags, const RawLoopTags& from, RawLoopT
 {
 }
 
-void TagsCarrier::carry()
+void LoopTagsCarrier::carry()
 {
-    if (hasUnknownCategories(from_) && isSameKind_ && !to_.categories)
+    if (hasUnknownLoopCategories(from_) && isSameKind_ && !to_.categories)
         to_.categories = from_.categories;
-    else if (hasUnknownCategories(from_) && from_.categories != to_.categories)
+    else if (hasUnknownLoopCategories(from_) && from_.categories != to_.categories)
         notKept_.emplace_back("the chunk \"cate\" is not kept: its layout is not known");
-    for (const TagField& field : tagFields()) {
+    for (const LoopTagField& field : loopTagFields()) {
         const std::string_view name = field.name;
         if (name == "signatureTop")
-            carryNumbers(fieldsForKey("signature"));
-        else if (field.kind == TagField::Kind::number && name != "signatureBottom")
+            carryNumbers(loopTagFieldsForKey("signature"));
+        else if (field.kind == LoopTagField::Kind::number && name != "signatureBottom")
             carryNumbers({&field});
-        else if (field.kind == TagField::Kind::list)
+        else if (field.kind == LoopTagField::Kind::list)
             carryDescriptors(field);
-        else if (field.kind == TagField::Kind::text)
+        else if (field.kind == LoopTagField::Kind::text)
             carryText(field);
     }
 }
 
-void TagsCarrier::carryNumbers(const std::vector<const TagField*>& fields)
+void LoopTagsCarrier::carryNumbers(const std::vector<const LoopTagField*>& fields)
 {
-    if (isSameKind_ && copyPair(to_, from_, *fields.front()))
+    if (isSameKind_ && copyLoopPair(to_, from_, *fields.front()))
         return;
-    std::vector<TagAssignment> assignments;
+    std::vector<LoopTagAssignment> assignments;
     std::string words;
     bool isThere = false;
-    for (const TagField* field : fields) {
+    for (const LoopTagField* field : fields) {
         const std::int64_t number = tags_.number(field->key);
         assignments.push_back({field, {}});
         assignments.back().value = number;
@@ -78,12 +75,12 @@ void TagsCarrier::carryNumbers(const std::vector<const TagField*>& fields)
     const std::string name = fields.size() == 1 ? fields.front()->name : "signature";
     if (name == "loopFileType") {
         // A CAF file neither keeps it nor has one: what it is follows from the other tags.
-        const bool isKnown = !isAbsent(valueUnder(combinedTagsOf(to_), fields.front()->key));
+        const bool isKnown = !isAbsentLoopTag(loopValueUnder(combinedLoopTagsOf(to_), fields.front()->key));
         if (to_.fileType == kAIFF && (isSameKind_ || tags_.number(fields.front()->key) == 1 || !isKnown))
             assign(assignments, true);
         return;
     }
-    const auto text = pairText(from_, *fields.front());
+    const auto text = loopPairText(from_, *fields.front());
     const bool isCut =
         name == "beatCount" && text && words == std::to_string(std::numeric_limits<int>::max()) && *text != words;
     if (isCut)
@@ -92,17 +89,17 @@ void TagsCarrier::carryNumbers(const std::vector<const TagField*>& fields)
         lose(name, words, why_);
 }
 
-void TagsCarrier::carryText(const TagField& field)
+void LoopTagsCarrier::carryText(const LoopTagField& field)
 {
     const bool isComments = field.key == std::string_view(VireoLoopFileInfoChunkDataCommentsKey);
-    const auto raw = rawText(from_, field);
+    const auto raw = rawLoopText(from_, field);
     if (!raw || (isComments && isBlank(*raw)))
         return;
     std::string text = tags_.text(field.key);
     if (text.empty() && !isSameKind_)
         return lose(field.name, *raw, kNoText);
     if (isSameKind_ && (text.empty() || !isComments)) {
-        if (const TagAssignment assignment{&field, *raw}; !assign({&assignment, 1}, false))
+        if (const LoopTagAssignment assignment{&field, *raw}; !assign({&assignment, 1}, false))
             lose(field.name, *raw, why_);
         return;
     }
@@ -113,20 +110,20 @@ void TagsCarrier::carryText(const TagField& field)
         const std::size_t start = kept && !kept->empty() ? text.find(*kept) : 0;
         if (kept && *kept != text && isBlank(text.substr(0, start)) && isBlank(text.substr(start + kept->size()))) {
             text = *kept;
-            notKept_.push_back(fmt::format("the white space around {} is not kept", field.name));
+            notKept_.push_back("the white space around " + std::string(field.name) + " is not kept");
         }
     }
-    if (const TagAssignment assignment{&field, text}; !assign({&assignment, 1}, true))
+    if (const LoopTagAssignment assignment{&field, text}; !assign({&assignment, 1}, true))
         lose(field.name, text, text.find('\0') != std::string::npos ? " (it holds a NUL)" : why_);
     else if (!isComments && platform::String::fromUTF8(*raw) && *raw != text)
-        notKept_.push_back(fmt::format("{} {} is kept as {}", field.name, cut(*raw), cut(text)));
+        notKept_.push_back(field.name + (" " + cut(*raw)) + " is kept as " + cut(text));
 }
 
-void TagsCarrier::carryDescriptors(const TagField& field)
+void LoopTagsCarrier::carryDescriptors(const LoopTagField& field)
 {
-    if (isSameKind_ && copyPair(to_, from_, field))
+    if (isSameKind_ && copyLoopPair(to_, from_, field))
         return;
-    const std::vector<std::string> raw = rawDescriptors(from_);
+    const std::vector<std::string> raw = rawLoopDescriptors(from_);
     platform::Array kept;
     if (isSameKind_) {
         kept.assign(raw.begin(), raw.end());
@@ -134,7 +131,7 @@ void TagsCarrier::carryDescriptors(const TagField& field)
         for (const std::string& each : raw)
             if (!platform::String::fromUTF8(each))
                 lose(field.name, each, kNoText);
-        const Value read = valueUnder(tags_.combined, field.key);
+        const Value read = loopValueUnder(tags_.combined, field.key);
         const auto* list = read.get<platform::Array>();
         for (const Value& value : list != nullptr ? *list : platform::Array()) {
             const std::string& each = *value.get<std::string>();
@@ -145,42 +142,41 @@ void TagsCarrier::carryDescriptors(const TagField& field)
         }
     }
     const std::size_t count = kept.size();
-    if (const TagAssignment assignment{&field, std::move(kept)}; count > 0 && !assign({&assignment, 1}, !isSameKind_))
+    if (const LoopTagAssignment assignment{&field, std::move(kept)};
+        count > 0 && !assign({&assignment, 1}, !isSameKind_))
         lose(field.name, std::to_string(count), why_);
 }
 
 // Whether a file of the kind gives it back, were it the only one.
-bool TagsCarrier::isKept(const TagField& field, const std::string& descriptor) const
+bool LoopTagsCarrier::isKept(const LoopTagField& field, const std::string& descriptor) const
 {
     RawLoopTags alone;
     alone.fileType = to_.fileType;
-    const TagAssignment assignment{&field, platform::Array(1, descriptor)};
-    assignTags(alone, {&assignment, 1});
-    return valueUnder(combinedTagsOf(alone), field.key) == assignment.value;
+    const LoopTagAssignment assignment{&field, platform::Array(1, descriptor)};
+    assignLoopTags(alone, {&assignment, 1});
+    return loopValueUnder(combinedLoopTagsOf(alone), field.key) == assignment.value;
 }
 
 // False when there is no room for it; then all is as before.
-bool TagsCarrier::assign(std::span<const TagAssignment> assignments, bool mustBeRead)
+bool LoopTagsCarrier::assign(std::span<const LoopTagAssignment> assignments, bool mustBeRead)
 {
     RawLoopTags bytes = to_;
     why_.clear();
-    try {
-        assignTags(bytes, assignments);
-    } catch (const Failure& failure) {
-        why_ = fmt::format(" ({})", failure.what());
+    if (platform::Error error; !assignLoopTags(bytes, assignments, &error)) {
+        why_ = " (" + error.description + ")";
         return false;
     }
     if (mustBeRead) {
-        const platform::Dictionary combined = combinedTagsOf(bytes), info = infoTextsOf(bytes);
+        const platform::Dictionary combined = combinedLoopTagsOf(bytes), info = loopTextsOf(bytes);
         for (const auto& [field, value] : assignments)
-            if (valueUnder(field->isFileInfo ? info : combined, field->key) != value)
+            if (loopValueUnder(field->isFileInfo ? info : combined, field->key) != value)
                 return false;
     }
     to_ = std::move(bytes);
     return true;
 }
 
-void TagsCarrier::lose(const std::string& name, const std::string& value, const std::string& why)
+void LoopTagsCarrier::lose(const std::string& name, const std::string& value, const std::string& why)
 {
-    notKept_.push_back(fmt::format("{} {} is not kept{}", name, cut(value), why));
+    notKept_.push_back(name + " " + cut(value) + " is not kept" + why);
 }

@@ -2,26 +2,26 @@
 // between AIFF and CAF.
 #pragma once
 
-#include "tool/shared/looptags/LoopTags.h"
-#include "tool/shared/looptags/LoopTagsPatch.h"
+#include "loops/tags/LoopTags.h"
+#include "loops/tags/LoopTagsPatch.h"
 
 #include <string>
 #include <vector>
 
 /// Each field for itself: one that cannot be kept is told, and costs nothing but itself.
-class TagsCarrier {
+class LoopTagsCarrier {
 public:
     /// `tags` and `from` are of the same file.
-    TagsCarrier(const LoopTags& tags, const RawLoopTags& from, RawLoopTags& to, std::vector<std::string>& notKept);
+    LoopTagsCarrier(const LoopTags& tags, const RawLoopTags& from, RawLoopTags& to, std::vector<std::string>& notKept);
 
     void carry();
 
 private:
-    void carryNumbers(const std::vector<const TagField*>& fields);
-    void carryText(const TagField& field);
-    void carryDescriptors(const TagField& field);
-    bool assign(std::span<const TagAssignment> assignments, bool mustBeRead);
-    bool isKept(const TagField& field, const std::string& descriptor) const;
+    void carryNumbers(const std::vector<const LoopTagField*>& fields);
+    void carryText(const LoopTagField& field);
+    void carryDescriptors(const LoopTagField& field);
+    bool assign(std::span<const LoopTagAssignment> assignments, bool mustBeRead);
+    bool isKept(const LoopTagField& field, const std::string& descriptor) const;
     void lose(const std::string& name, const std::string& value, const std::string& why = {});
 
     const LoopTags& tags_;

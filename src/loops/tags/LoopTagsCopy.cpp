@@ -1,10 +1,10 @@
-#include "tool/shared/looptags/LoopTagsCopy.h"
+#include "loops/tags/LoopTagsCopy.h"
 
+#include "loops/tags/LoopTagFields.h"
+#include "loops/tags/LoopTagsCarrier.h"
+#include "loops/tags/LoopTagsPatch.h"
+#include "loops/tags/WaveLoopTags.h"
 #include "media/containers/ContainerHeaders.h"
-#include "tool/shared/looptags/LoopTagFields.h"
-#include "tool/shared/looptags/LoopTagsPatch.h"
-#include "tool/shared/looptags/TagsCarrier.h"
-#include "tool/shared/looptags/WaveLoopTags.h"
 
 #include <algorithm>
 #include <limits>
@@ -24,18 +24,18 @@ bool canHold(FourCC fileType, const VireoLoopBaseChunk& chunk)
 }
 
 // A list of the source's chunks that differ from what the target has, of the kinds that need no thought.
-std::vector<std::size_t> differingChunks(const LoopSource& source, const std::string& target, TagsPlan& plan)
+std::vector<std::size_t> differingChunks(const LoopSource& source, VireoLoopChunksManager& target, LoopTagsPlan& plan)
 {
     VireoLoopChunkList there = VireoLoopChunks::Empty();
-    openLoopFile(target, platform::AudioFile::Permission::read).readChunks(there);
+    target.readChunks(there);
     std::vector<std::size_t> differing;
     for (std::size_t i = 0; i < there.size(); ++i) {
         const VireoLoopBaseChunk& chunk = *source.chunks[i];
         if (!isCarried(chunk) || chunk.chunkData().isEmpty())
             continue;
-        const std::string name = carriedChunkName(chunk);
+        const std::string name = carriedLoopChunkName(chunk);
         if (!canHold(plan.after.fileType, chunk)) {
-            plan.notKept.push_back(fmt::format("{} is not kept: it belongs to CAF files", name));
+            plan.notKept.push_back(name + " is not kept: it belongs to CAF files");
             continue;
         }
         const Bytes bytes = *chunk.chunkData().cafDataRepresentation();
@@ -47,7 +47,7 @@ std::vector<std::size_t> differingChunks(const LoopSource& source, const std::st
         plan.after.chunks.push_back({name, static_cast<std::uint32_t>(bytes.size())});
         if (old && old->size() == bytes.size())
             plan.changes.push_back(
-                {name, fmt::format("{} other bytes", bytes.size()), fmt::format("{} bytes", bytes.size())});
+                {name, std::to_string(bytes.size()) + " other bytes", std::to_string(bytes.size()) + " bytes"});
     }
     return differing;
 }
@@ -63,8 +63,8 @@ std::vector<VireoLoopTransient> transientsFor(FourCC fileType, std::vector<Vireo
             return transient.frame() > std::numeric_limits<std::uint32_t>::max();
         });
     if (transients.size() < all)
-        notKept.push_back(
-            fmt::format("{} transients are not kept: they lie too far for an AIFF file", all - transients.size()));
+        notKept.push_back(std::to_string(all - transients.size()) +
+                          " transients are not kept: they lie too far for an AIFF file");
     for (VireoLoopTransient& transient : transients)
         transient.setTransientType(fileType == kAIFF
                                        ? std::int32_t{static_cast<std::int16_t>(transient.transientType())}
@@ -72,18 +72,18 @@ std::vector<VireoLoopTransient> transientsFor(FourCC fileType, std::vector<Vireo
     return transients;
 }
 
-void carryTransients(const LoopSource& source, const LoopTags& before, TagsPlan& plan)
+void carryTransients(const LoopSource& source, const LoopTags& before, LoopTagsPlan& plan)
 {
-    const auto fields = transientFieldsOf(source.bytes);
+    const auto fields = loopTransientFieldsOf(source.bytes);
     const auto transients = transientsFor(before.fileType, source.tags.transients, plan.notKept);
     if (transients.empty() || !fields)
         return;
     plan.after.transients = transients;
     if (transients != before.transients)
-        assignTransients(plan.bytes, transients);
-    if (transientFieldsOf(plan.bytes) == fields)
+        assignLoopTransients(plan.bytes, transients);
+    if (loopTransientFieldsOf(plan.bytes) == fields)
         return;
-    assignTransientFields(plan.bytes, *fields);
+    assignLoopTransientFields(plan.bytes, *fields);
     if (transients == before.transients)
         plan.changes.push_back({"transients", "other version, detection or division", transients.size()});
 }
@@ -95,62 +95,81 @@ bool writeCarried(VireoLoopChunksManager& manager, const LoopSource& source, con
     });
 }
 
-TagsPlan planCopyToWave(const LoopSource& source, const LoopTags& before, const std::string& target)
+std::optional<LoopTagsPlan> planCopyToWave(const LoopSource& source, const LoopTags& before,
+                                           const platform::URLRef& target, platform::Error* error)
 {
-    VireoLoopChunksManager manager = openLoopFile(target, platform::AudioFile::Permission::read, LoopFiles::waveToo);
-    const RawLoopTags chunks = readRawLoopTags(manager);
-    TagsPlan plan;
-    plan.bytes = chunks;
-    assignWaveTags(plan.bytes, source.tags, before);
-    plan.after = tagsWithWaveChunks(target, before, plan.bytes);
-    plan.changes = differences(before, plan.after);
-    if (plan.changes.empty() && plan.bytes != chunks)
+    auto manager = openLoopFile(target, platform::AudioFile::Permission::read, LoopFiles::waveToo, error);
+    auto chunks = manager ? readRawLoopTags(*manager, error) : std::nullopt;
+    if (!chunks)
+        return std::nullopt;
+    std::optional<LoopTagsPlan> planned(std::in_place);
+    LoopTagsPlan& plan = *planned;
+    plan.bytes = *chunks;
+    if (!assignWaveLoopTags(plan.bytes, source.tags, before, error))
+        return std::nullopt;
+    if (auto after = loopTagsWithWaveChunks(*manager, before, plan.bytes, error))
+        plan.after = std::move(*after);
+    else
+        return std::nullopt;
+    plan.changes = loopTagDifferences(before, plan.after);
+    if (plan.changes.empty() && plan.bytes != *chunks)
         plan.changes.push_back({"tags", "other bytes", {}});
-    plan.notKept = lossesInWave(source.tags, plan.after);
-    plan.write = [chunks, after = plan.bytes](VireoLoopChunksManager& file) {
-        return writeRawLoopTags(file, chunks, after);
+    plan.notKept = loopTagsLostInWave(source.tags, plan.after);
+    plan.write = [was = std::move(*chunks), after = plan.bytes](VireoLoopChunksManager& file) {
+        return writeRawLoopTags(file, was, after);
     };
-    return plan;
+    return planned;
 }
 
 } // namespace
 
-std::shared_ptr<LoopSource> readLoopSource(const std::string& path)
+std::shared_ptr<LoopSource> readLoopSource(const platform::URLRef& file, platform::Error* error)
 {
     auto source = std::make_shared<LoopSource>();
-    source->tags = readOwnLoopTags(path);
+    auto tags = readOwnLoopTags(file, error);
+    if (!tags)
+        return nullptr;
+    source->tags = std::move(*tags);
     if (source->tags.fileType != kAIFF && source->tags.fileType != kCaff) {
         source->bytes = asLoopChunks(source->tags, source->notKept);
         return source;
     }
-    VireoLoopChunksManager manager = openLoopFile(path, platform::AudioFile::Permission::read);
-    manager.readChunks(source->chunks);
-    source->bytes = readRawLoopTags(manager);
+    auto manager = openLoopFile(file, platform::AudioFile::Permission::read, LoopFiles::withLoopChunks, error);
+    if (!manager)
+        return nullptr;
+    manager->readChunks(source->chunks);
+    auto bytes = readRawLoopTags(*manager, error);
+    if (!bytes)
+        return nullptr;
+    source->bytes = std::move(*bytes);
     return source;
 }
 
-TagsPlan planTagsCopy(const std::shared_ptr<const LoopSource>& source, const LoopTags& before,
-                      const std::string& target)
+std::optional<LoopTagsPlan> planLoopTagsCopy(const std::shared_ptr<const LoopSource>& source, const LoopTags& before,
+                                             const platform::URLRef& target, platform::Error* error)
 {
     if (before.fileType == kWAVE)
-        return planCopyToWave(*source, before, target);
-    VireoLoopChunksManager manager = openLoopFile(target, platform::AudioFile::Permission::read);
-    const RawLoopTags bytes = readRawLoopTags(manager);
-    TagsPlan plan;
+        return planCopyToWave(*source, before, target, error);
+    auto manager = openLoopFile(target, platform::AudioFile::Permission::read, LoopFiles::withLoopChunks, error);
+    auto bytes = manager ? readRawLoopTags(*manager, error) : std::nullopt;
+    if (!bytes)
+        return std::nullopt;
+    std::optional<LoopTagsPlan> planned(std::in_place);
+    LoopTagsPlan& plan = *planned;
     plan.after = before;
-    plan.bytes = bytes;
+    plan.bytes = *bytes;
     plan.notKept = source->notKept;
-    TagsCarrier(source->tags, source->bytes, plan.bytes, plan.notKept).carry();
-    plan.after.combined = combinedTagsOf(plan.bytes);
-    plan.after.info = infoTextsOf(plan.bytes);
+    LoopTagsCarrier(source->tags, source->bytes, plan.bytes, plan.notKept).carry();
+    plan.after.combined = combinedLoopTagsOf(plan.bytes);
+    plan.after.info = loopTextsOf(plan.bytes);
     carryTransients(*source, before, plan);
-    const auto chunks = differingChunks(*source, target, plan);
-    const auto changes = differences(before, plan.after);
+    const auto chunks = differingChunks(*source, *manager, plan);
+    const auto changes = loopTagDifferences(before, plan.after);
     plan.changes.insert(plan.changes.begin(), changes.begin(), changes.end());
-    if (plan.changes.empty() && plan.bytes != bytes)
+    if (plan.changes.empty() && plan.bytes != *bytes)
         plan.changes.push_back({"tags", "other bytes", {}});
-    plan.write = [source, bytes, after = plan.bytes, chunks](VireoLoopChunksManager& file) {
-        return writeRawLoopTags(file, bytes, after) && writeCarried(file, *source, chunks);
+    plan.write = [source, was = std::move(*bytes), after = plan.bytes, chunks](VireoLoopChunksManager& file) {
+        return writeRawLoopTags(file, was, after) && writeCarried(file, *source, chunks);
     };
-    return plan;
+    return planned;
 }

@@ -2,8 +2,8 @@
 #pragma once
 
 #include "loops/VireoLoopChunks.h"
-#include "tool/shared/looptags/LoopTags.h"
-#include "tool/shared/looptags/LoopTagsEdit.h"
+#include "loops/tags/LoopTags.h"
+#include "loops/tags/LoopTagsPlan.h"
 
 #include <memory>
 #include <string>
@@ -18,11 +18,12 @@ struct LoopSource {
     bool isEmpty() const { return tags.isEmpty(); }
 };
 
-/// Throws Failure.
-std::shared_ptr<LoopSource> readLoopSource(const std::string& path);
+/// None when it cannot be read, or is no file that can have loop tags.
+KT_EXPORT std::shared_ptr<LoopSource> readLoopSource(const platform::URLRef& file, platform::Error* error = nullptr);
 
 /// What of it changes in the file `target`, whose tags are `before`: each takes the place of what is there, what the
 /// source does not have stays. What the target has no room for, or what cannot be read between two kinds of file, is
-/// told and costs nothing else. Throws Failure.
-TagsPlan planTagsCopy(const std::shared_ptr<const LoopSource>& source, const LoopTags& before,
-                      const std::string& target);
+/// told and costs nothing else.
+KT_EXPORT std::optional<LoopTagsPlan> planLoopTagsCopy(const std::shared_ptr<const LoopSource>& source,
+                                                       const LoopTags& before, const platform::URLRef& target,
+                                                       platform::Error* error = nullptr);

@@ -1,39 +1,57 @@
 // How AIFF and CAF files hold loop tags: the two halves of LoopTagsPatch, and what they share.
 #pragma once
 
-#include "tool/shared/looptags/LoopTagsPatch.h"
+#include "loops/VireoLoopCombinedTagsChunkDataTypes.h"
+#include "loops/tags/LoopTagsPatch.h"
 
 #include <algorithm>
 #include <iterator>
+#include <string_view>
+
+/// Of the numbers, as views, so that they compare by their letters.
+namespace loopkeys {
+inline constexpr std::string_view kBeatCount = VireoLoopCombinedTagsChunkDataBeatCountKey;
+inline constexpr std::string_view kRootNote = VireoLoopCombinedTagsChunkDataMidiRootNoteKey;
+inline constexpr std::string_view kKeyType = VireoLoopCombinedTagsChunkDataKeyType;
+inline constexpr std::string_view kTop = VireoLoopCombinedTagsChunkDataSignatureTopKey;
+inline constexpr std::string_view kBottom = VireoLoopCombinedTagsChunkDataSignatureBottomKey;
+} // namespace loopkeys
 
 // AIFF: fields of "basc" and "cate", text chunks.
 
-void assignAIFFTags(RawLoopTags& tags, std::span<const TagAssignment> assignments);
-std::optional<std::string> rawAIFFText(const RawLoopTags& tags, const TagField& field);
-std::vector<std::string> rawAIFFDescriptors(const RawLoopTags& tags);
+bool assignAIFFLoopTags(RawLoopTags& tags, std::span<const LoopTagAssignment> assignments, platform::Error* error);
+std::optional<std::string> rawAIFFLoopText(const RawLoopTags& tags, const LoopTagField& field);
+std::vector<std::string> rawAIFFLoopDescriptors(const RawLoopTags& tags);
 
-// CAF: pairs of texts. `pairText` is in LoopTagsPatch.h.
+// CAF: pairs of texts. `loopPairText` is in LoopTagsPatch.h.
 
-void assignCAFTags(RawLoopTags& tags, std::span<const TagAssignment> assignments);
+void assignCAFLoopTags(RawLoopTags& tags, std::span<const LoopTagAssignment> assignments);
 
 // What an assignment says; 0 and "" where it says nothing.
 
-inline std::int64_t assignedNumber(const platform::Value& value)
+inline std::int64_t assignedLoopNumber(const platform::Value& value)
 {
     const auto* number = value.get<std::int64_t>();
     return number != nullptr ? *number : 0;
 }
 
-inline std::string assignedText(const platform::Value& value)
+inline std::string assignedLoopText(const platform::Value& value)
 {
     const auto* text = value.get<std::string>();
     return text != nullptr ? *text : std::string();
 }
 
-inline std::vector<std::string> assignedTexts(const platform::Value& value)
+inline std::vector<std::string> assignedLoopTexts(const platform::Value& value)
 {
     std::vector<std::string> texts;
     if (const auto* list = value.get<platform::Array>())
-        std::ranges::transform(*list, std::back_inserter(texts), assignedText);
+        std::ranges::transform(*list, std::back_inserter(texts), assignedLoopText);
     return texts;
+}
+
+/// The value under a key; null when there is none.
+inline platform::Value loopValueUnder(const platform::Dictionary& values, const char* key)
+{
+    const auto found = values.find(key);
+    return found == values.end() ? platform::Value() : found->second;
 }

@@ -1,36 +1,36 @@
-#include "tool/shared/looptags/LoopTagsPatch.h"
+#include "loops/tags/LoopTagsPatch.h"
 
 #include "loops/VireoLoopFileInfoChunkDataTypes.h"
+#include "loops/tags/LoopTagsLayouts.h"
 #include "media/containers/ContainerHeaders.h"
 #include "platform/String.h"
-#include "tool/shared/looptags/LoopTagsLayouts.h"
 
-void assignTags(RawLoopTags& tags, std::span<const TagAssignment> assignments)
+bool assignLoopTags(RawLoopTags& tags, std::span<const LoopTagAssignment> assignments, platform::Error* error)
 {
     if (tags.fileType == kAIFF)
-        assignAIFFTags(tags, assignments);
-    else
-        assignCAFTags(tags, assignments);
+        return assignAIFFLoopTags(tags, assignments, error);
+    assignCAFLoopTags(tags, assignments);
+    return true;
 }
 
-std::optional<std::string> rawText(const RawLoopTags& tags, const TagField& field)
+std::optional<std::string> rawLoopText(const RawLoopTags& tags, const LoopTagField& field)
 {
-    return tags.fileType == kAIFF ? rawAIFFText(tags, field) : pairText(tags, field);
+    return tags.fileType == kAIFF ? rawAIFFLoopText(tags, field) : loopPairText(tags, field);
 }
 
-std::vector<std::string> rawDescriptors(const RawLoopTags& tags)
+std::vector<std::string> rawLoopDescriptors(const RawLoopTags& tags)
 {
     if (tags.fileType == kAIFF)
-        return rawAIFFDescriptors(tags);
-    const auto text = pairText(tags, *fieldsForKey("descriptors").front());
+        return rawAIFFLoopDescriptors(tags);
+    const auto text = loopPairText(tags, *loopTagFieldsForKey("descriptors").front());
     return text ? std::vector{*text} : std::vector<std::string>();
 }
 
-platform::Dictionary infoTextsOf(const RawLoopTags& tags)
+platform::Dictionary loopTextsOf(const RawLoopTags& tags)
 {
     platform::Dictionary texts;
-    for (const TagField& field : tagFields()) {
-        auto text = field.isFileInfo ? rawText(tags, field) : std::nullopt;
+    for (const LoopTagField& field : loopTagFields()) {
+        auto text = field.isFileInfo ? rawLoopText(tags, field) : std::nullopt;
         const auto id = VireoLoopFileInfoChunkDataTypes::fileInfoTypeForKey(field.isFileInfo ? field.key : "");
         if (text && tags.fileType == kAIFF && field.key == std::string_view(VireoLoopFileInfoChunkDataCommentsKey))
             text = VireoLoopFileInfoChunkDataTypes::commentStringFromAifCommentChunkData(tags.texts.at(id));

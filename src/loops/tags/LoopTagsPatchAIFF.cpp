@@ -2,10 +2,8 @@
 #include "loops/VireoLoopCombinedTagsChunkDataTypes.h"
 #include "loops/VireoLoopFileInfoChunkDataTypes.h"
 #include "loops/tagging/Chunks.h"
-#include "tool/shared/looptags/LoopTagsLayouts.h"
-#include "tool/shared/output/Failure.h"
-
-#include <fmt/format.h>
+#include "loops/tags/LoopTagsError.h"
+#include "loops/tags/LoopTagsLayouts.h"
 
 #include <cstring>
 #include <set>
@@ -15,13 +13,9 @@ using tagging::BasicTaggingChunk;
 using tagging::CategoryChunk;
 using tagging::kCategoryTextSize;
 
-namespace {
+using namespace loopkeys;
 
-constexpr std::string_view kBeatCount = VireoLoopCombinedTagsChunkDataBeatCountKey;
-constexpr std::string_view kRootNote = VireoLoopCombinedTagsChunkDataMidiRootNoteKey;
-constexpr std::string_view kKeyType = VireoLoopCombinedTagsChunkDataKeyType;
-constexpr std::string_view kTop = VireoLoopCombinedTagsChunkDataSignatureTopKey;
-constexpr std::string_view kBottom = VireoLoopCombinedTagsChunkDataSignatureBottomKey;
+namespace {
 
 bool isZeroFrom(BytesView bytes, std::size_t start)
 {
@@ -48,23 +42,31 @@ std::size_t offsetInBasic(std::string_view key)
                              : offsetof(BasicTaggingChunk, fileType);
 }
 
-void assignBasic(std::optional<Bytes>& chunk, std::string_view key, std::int64_t number)
+// "its chunk "basc" is cut short (80 of 82 bytes); tags remove takes it off".
+bool failForCut(platform::Error* error, const char* id, std::size_t size, std::size_t whole)
+{
+    return failWith(error, LoopTagsError::damagedChunk,
+                    "its chunk \"" + std::string(id) + "\" is cut short (" + std::to_string(size) + " of " +
+                        std::to_string(whole) + " bytes); tags remove takes it off");
+}
+
+bool assignBasic(std::optional<Bytes>& chunk, std::string_view key, std::int64_t number, platform::Error* error)
 {
     if (!chunk && number == 0)
-        return;
+        return true;
     Bytes bytes = chunk ? *chunk : newChunk(sizeof(BasicTaggingChunk));
     if (bytes.size() < sizeof(BasicTaggingChunk))
-        throw Failure(fmt::format("its chunk \"basc\" is cut short ({} of {} bytes); tags remove takes it off",
-                                  bytes.size(), sizeof(BasicTaggingChunk)));
+        return failForCut(error, "basc", bytes.size(), sizeof(BasicTaggingChunk));
     if (key == kBeatCount)
         storeBE(bytes.data() + offsetof(BasicTaggingChunk, beatCount), static_cast<std::int32_t>(number));
     else
         storeBE(bytes.data() + offsetInBasic(key), static_cast<std::int16_t>(number));
     if (bytes == chunk)
-        return;
+        return true;
     chunk = std::move(bytes);
     if (isZeroFrom(*chunk, offsetof(BasicTaggingChunk, beatCount)))
         chunk.reset();
+    return true;
 }
 
 // AIFF "cate".
@@ -142,31 +144,32 @@ void assignDescriptors(Bytes& chunk, const CategoryLayout& layout, const std::ve
     chunk = std::move(bytes);
 }
 
-void assignCategory(std::optional<Bytes>& chunk, const TagField& field, const Value& value)
+bool assignCategory(std::optional<Bytes>& chunk, const LoopTagField& field, const Value& value, platform::Error* error)
 {
-    const bool isList = field.kind == TagField::Kind::list;
-    if (!chunk && (isList ? assignedTexts(value).empty() : assignedText(value).empty()))
-        return;
+    const bool isList = field.kind == LoopTagField::Kind::list;
+    if (!chunk && (isList ? assignedLoopTexts(value).empty() : assignedLoopText(value).empty()))
+        return true;
     Bytes bytes = chunk ? *chunk : newChunk(sizeof(CategoryChunk));
     const auto layout = layoutOf(bytes);
     if (!layout && bytes.size() < sizeof(CategoryChunk))
-        throw Failure(fmt::format("its chunk \"cate\" is cut short ({} of {} bytes); tags remove takes it off",
-                                  bytes.size(), sizeof(CategoryChunk)));
+        return failForCut(error, "cate", bytes.size(), sizeof(CategoryChunk));
     if (!layout)
-        throw Failure(fmt::format("its chunk \"cate\" is of version {}, whose layout is not known",
-                                  loadBE<std::uint32_t>(bytes.data())));
+        return failWith(error, LoopTagsError::damagedChunk,
+                        "its chunk \"cate\" is of version " + std::to_string(loadBE<std::uint32_t>(bytes.data())) +
+                            ", whose layout is not known");
     if (isList) {
-        assignDescriptors(bytes, *layout, assignedTexts(value));
+        assignDescriptors(bytes, *layout, assignedLoopTexts(value));
     } else {
         const std::size_t offset = offsetInCategories(field.key);
-        if (fieldText(BytesView(bytes).subspan(offset, kCategoryTextSize)) != assignedText(value))
-            storeField(bytes.data() + offset, assignedText(value));
+        if (fieldText(BytesView(bytes).subspan(offset, kCategoryTextSize)) != assignedLoopText(value))
+            storeField(bytes.data() + offset, assignedLoopText(value));
     }
     if (bytes == chunk)
-        return;
+        return true;
     chunk = std::move(bytes);
     if (isZeroFrom(*chunk, offsetof(CategoryChunk, instrumentType)))
         chunk.reset();
+    return true;
 }
 
 // AIFF "COMT": a count, then for each comment a time stamp (4 bytes), a marker (2), the text's size (2) and the text,
@@ -212,7 +215,7 @@ std::optional<Bytes> assignedComment(const std::optional<Bytes>& chunk, const st
     return bytes;
 }
 
-void assignAIFFText(std::map<FourCC, Bytes>& texts, const TagField& field, const std::string& text)
+void assignAIFFText(std::map<FourCC, Bytes>& texts, const LoopTagField& field, const std::string& text)
 {
     const FourCC id = VireoLoopFileInfoChunkDataTypes::fileInfoTypeForKey(field.key);
     const auto found = texts.find(id);
@@ -232,18 +235,22 @@ void assignAIFFText(std::map<FourCC, Bytes>& texts, const TagField& field, const
 
 } // namespace
 
-void assignAIFFTags(RawLoopTags& tags, std::span<const TagAssignment> assignments)
+bool assignAIFFLoopTags(RawLoopTags& tags, std::span<const LoopTagAssignment> assignments, platform::Error* error)
 {
-    for (const auto& [field, value] : assignments)
+    for (const auto& [field, value] : assignments) {
         if (field->isFileInfo)
-            assignAIFFText(tags.texts, *field, assignedText(value));
-        else if (field->kind == TagField::Kind::number)
-            assignBasic(tags.basic, field->key, assignedNumber(value));
-        else if (field->kind != TagField::Kind::transients)
-            assignCategory(tags.categories, *field, value);
+            assignAIFFText(tags.texts, *field, assignedLoopText(value));
+        else if (field->kind == LoopTagField::Kind::number &&
+                 !assignBasic(tags.basic, field->key, assignedLoopNumber(value), error))
+            return false;
+        else if (field->kind != LoopTagField::Kind::number && field->kind != LoopTagField::Kind::transients &&
+                 !assignCategory(tags.categories, *field, value, error))
+            return false;
+    }
+    return true;
 }
 
-std::optional<std::string> rawAIFFText(const RawLoopTags& tags, const TagField& field)
+std::optional<std::string> rawAIFFLoopText(const RawLoopTags& tags, const LoopTagField& field)
 {
     std::string_view text;
     const auto found = tags.texts.find(VireoLoopFileInfoChunkDataTypes::fileInfoTypeForKey(field.key));
@@ -257,13 +264,13 @@ std::optional<std::string> rawAIFFText(const RawLoopTags& tags, const TagField& 
     return text.empty() ? std::nullopt : std::optional(std::string(text));
 }
 
-std::vector<std::string> rawAIFFDescriptors(const RawLoopTags& tags)
+std::vector<std::string> rawAIFFLoopDescriptors(const RawLoopTags& tags)
 {
     const auto layout = tags.categories ? layoutOf(*tags.categories) : std::nullopt;
     return layout ? descriptorFields(*tags.categories, *layout).texts : std::vector<std::string>();
 }
 
-bool hasUnknownCategories(const RawLoopTags& tags)
+bool hasUnknownLoopCategories(const RawLoopTags& tags)
 {
     return tags.categories && !layoutOf(*tags.categories);
 }

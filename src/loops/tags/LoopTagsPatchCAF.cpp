@@ -2,25 +2,20 @@
 #include "audiofile/metadata/CAFTextPairs.h"
 #include "loops/VireoLoopCombinedTagsChunkDataTypes.h"
 #include "loops/VireoLoopTerms.h"
+#include "loops/tags/LoopTagsLayouts.h"
 #include "media/containers/ContainerHeaders.h"
-#include "tool/shared/looptags/LoopTagsLayouts.h"
-
-#include <fmt/format.h>
 
 using platform::Value;
+
+using namespace loopkeys;
 
 namespace {
 
 constexpr FourCC kInfo = fourCC("info");
-constexpr std::string_view kBeatCount = VireoLoopCombinedTagsChunkDataBeatCountKey;
-constexpr std::string_view kRootNote = VireoLoopCombinedTagsChunkDataMidiRootNoteKey;
-constexpr std::string_view kKeyType = VireoLoopCombinedTagsChunkDataKeyType;
-constexpr std::string_view kTop = VireoLoopCombinedTagsChunkDataSignatureTopKey;
-constexpr std::string_view kBottom = VireoLoopCombinedTagsChunkDataSignatureBottomKey;
 constexpr std::string_view kDescriptors = VireoLoopCombinedTagsChunkDataDescriptorsKey;
 
 // The pair that holds the field; both parts of a signature are in one. Null for the file type, which none holds.
-const char* cafKeyOf(const TagField& field)
+const char* cafKeyOf(const LoopTagField& field)
 {
     static constexpr std::pair<std::string_view, const char*> keys[] = {
         {kBeatCount, "beat count"},
@@ -42,13 +37,19 @@ const char* cafKeyOf(const TagField& field)
 }
 
 // The text that stands for a value; empty when none does.
-std::string cafText(const TagField& field, const Value& value)
+std::string cafText(const LoopTagField& field, const Value& value)
 {
-    const std::int64_t number = assignedNumber(value);
-    if (field.kind == TagField::Kind::text)
-        return assignedText(value);
-    if (field.kind == TagField::Kind::list)
-        return fmt::format("{}", fmt::join(assignedTexts(value), ","));
+    const std::int64_t number = assignedLoopNumber(value);
+    if (field.kind == LoopTagField::Kind::text)
+        return assignedLoopText(value);
+    if (field.kind == LoopTagField::Kind::list) {
+        std::string joined;
+        for (bool isFirst = true; const std::string& each : assignedLoopTexts(value)) {
+            joined += (isFirst ? "" : ",") + each;
+            isFirst = false;
+        }
+        return joined;
+    }
     if (field.key == kBeatCount)
         return number > 0 ? std::to_string(number) : "";
     if (field.key == kRootNote)
@@ -57,18 +58,19 @@ std::string cafText(const TagField& field, const Value& value)
 }
 
 // Nothing changes where the library reads what is asked for already; a text is compared as it stands.
-void assignPair(CAFTextPairs& pairs, const platform::Dictionary& read, const TagField& field, const Value& value)
+void assignPair(CAFTextPairs& pairs, const platform::Dictionary& read, const LoopTagField& field, const Value& value)
 {
     const std::string text = cafText(field, value);
     const auto there = read.find(field.key);
-    const bool isText = field.kind == TagField::Kind::text;
+    const bool isText = field.kind == LoopTagField::Kind::text;
     if (text.empty())
         pairs.erase(cafKeyOf(field));
     else if (isText || there == read.end() || there->second != value)
         pairs.set(cafKeyOf(field), text);
 }
 
-void assignSignature(CAFTextPairs& pairs, const platform::Dictionary& read, std::span<const TagAssignment> assignments)
+void assignSignature(CAFTextPairs& pairs, const platform::Dictionary& read,
+                     std::span<const LoopTagAssignment> assignments)
 {
     std::int64_t parts[] = {0, 0};
     const std::string_view keys[] = {kTop, kBottom};
@@ -76,17 +78,17 @@ void assignSignature(CAFTextPairs& pairs, const platform::Dictionary& read, std:
     for (std::size_t i = 0; i < 2; ++i) {
         const auto* there = platform::find<std::int64_t>(read, keys[i]);
         parts[i] = there != nullptr ? *there : 0;
-        for (const TagAssignment& assignment : assignments)
+        for (const LoopTagAssignment& assignment : assignments)
             if (assignment.field->key != nullptr && assignment.field->key == keys[i]) {
                 isNamed = true;
-                differs = differs || assignedNumber(assignment.value) != parts[i];
-                parts[i] = assignedNumber(assignment.value);
+                differs = differs || assignedLoopNumber(assignment.value) != parts[i];
+                parts[i] = assignedLoopNumber(assignment.value);
             }
     }
     if (isNamed && (parts[0] < 1 || parts[1] < 1))
         pairs.erase("time signature");
     else if (differs)
-        pairs.set("time signature", fmt::format("{}/{}", parts[0], parts[1]));
+        pairs.set("time signature", std::to_string(parts[0]) + '/' + std::to_string(parts[1]));
 }
 
 CAFTextPairs pairsOf(const std::optional<Bytes>& payload)
@@ -100,7 +102,7 @@ std::optional<Bytes> infoOf(const RawLoopTags& tags)
     return found == tags.texts.end() ? std::nullopt : std::optional(found->second);
 }
 
-CAFTextPairs pairsWith(const RawLoopTags& tags, const TagField& field)
+CAFTextPairs pairsWith(const RawLoopTags& tags, const LoopTagField& field)
 {
     return pairsOf(field.isFileInfo ? infoOf(tags) : tags.basic);
 }
@@ -117,9 +119,9 @@ void storePairs(RawLoopTags& tags, bool isFileInfo, const CAFTextPairs& pairs)
 
 } // namespace
 
-void assignCAFTags(RawLoopTags& tags, std::span<const TagAssignment> assignments)
+void assignCAFLoopTags(RawLoopTags& tags, std::span<const LoopTagAssignment> assignments)
 {
-    const platform::Dictionary read = combinedTagsOf(tags);
+    const platform::Dictionary read = combinedLoopTagsOf(tags);
     CAFTextPairs basic = pairsOf(tags.basic), info = pairsOf(infoOf(tags));
     const CAFTextPairs basicBefore = basic, infoBefore = info;
     assignSignature(basic, read, assignments);
@@ -132,7 +134,7 @@ void assignCAFTags(RawLoopTags& tags, std::span<const TagAssignment> assignments
         storePairs(tags, true, info);
 }
 
-std::optional<std::string> pairText(const RawLoopTags& tags, const TagField& field)
+std::optional<std::string> loopPairText(const RawLoopTags& tags, const LoopTagField& field)
 {
     const char* const key = tags.fileType != kAIFF ? cafKeyOf(field) : nullptr;
     const CAFTextPairs pairs = key != nullptr ? pairsWith(tags, field) : CAFTextPairs();
@@ -140,9 +142,9 @@ std::optional<std::string> pairText(const RawLoopTags& tags, const TagField& fie
     return text != nullptr && !text->empty() ? std::optional(*text) : std::nullopt;
 }
 
-bool copyPair(RawLoopTags& to, const RawLoopTags& from, const TagField& field)
+bool copyLoopPair(RawLoopTags& to, const RawLoopTags& from, const LoopTagField& field)
 {
-    const auto text = pairText(from, field);
+    const auto text = loopPairText(from, field);
     if (!text)
         return false;
     CAFTextPairs pairs = pairsWith(to, field);

@@ -1,13 +1,10 @@
 // What a file is read by, and which of its chunks say what.
 #include "audiofile/CAudioFileIO.h"
 #include "loops/VireoLoopUserDataUtils.h"
+#include "loops/tags/LoopTagFields.h"
+#include "loops/tags/LoopTags.h"
+#include "loops/tags/LoopTagsError.h"
 #include "media/containers/ContainerHeaders.h"
-#include "tool/shared/input/FileLocation.h"
-#include "tool/shared/input/InputFile.h"
-#include "tool/shared/looptags/LoopTagFields.h"
-#include "tool/shared/looptags/LoopTags.h"
-
-#include <fmt/format.h>
 
 #include <algorithm>
 
@@ -24,7 +21,7 @@ Chunk& addChunk(VireoLoopChunkList& list)
     return added;
 }
 
-void readLength(AudioFile& file, const std::string& path, LoopTags& tags)
+void readLength(AudioFile& file, const platform::URLRef& url, LoopTags& tags)
 {
     platform::StreamDescription format;
     std::uint64_t packets = 0;
@@ -33,7 +30,7 @@ void readLength(AudioFile& file, const std::string& path, LoopTags& tags)
     tags.sampleRate = format.sampleRate;
     tags.frames = packets * format.framesPerPacket;
     CAudioFileIO description;
-    if (!format.isLinearPCM() && description.Open(referenceTo(path), 0) == kStatusOK)
+    if (!format.isLinearPCM() && description.Open(CFileRef(url), 0) == kStatusOK)
         tags.frames = static_cast<std::uint64_t>(description.Info().frames); // without what fills packets up
 }
 
@@ -68,19 +65,15 @@ std::vector<LoopTags::Chunk> carriedChunks(AudioFile& file, FourCC fileType)
     std::vector<LoopTags::Chunk> found;
     for (const auto& chunk : kinds)
         if (const auto size = sizeOf(*chunk, file, fileType))
-            found.push_back({carriedChunkName(*chunk), *size});
+            found.push_back({carriedLoopChunkName(*chunk), *size});
     return found;
 }
 
-void requireOpen(std::int32_t status, const std::string& path)
+// What cannot be opened as an audio file is of another kind.
+bool hasOpened(std::int32_t status, platform::Error* error)
 {
-    if (status != kStatusOK)
-        requireRegularFile(path); // says best what is wrong with it
-    if (status == kStatusParameterError) {
-        requireKnown(path);
-        throw OtherKind("is no WAVE, AIFF or CAF file", OtherKind::Kind::unknown);
-    }
-    requireOK(status);
+    return status == kStatusParameterError ? failWith(error, LoopTagsError::unknownFile, "is no WAVE, AIFF or CAF file")
+                                           : succeeded(status, error);
 }
 
 struct TextField {
@@ -116,41 +109,49 @@ std::string sourceName(FourCC id)
     return id == fourCC("INFO") || id == fourCC("adtl") ? "LIST " + fourCCText(id) : fourCCText(id);
 }
 
-LoopTags readTags(const std::string& path, bool withSamplers)
+std::optional<LoopTags> readTags(const platform::URLRef& url, bool withSamplers, platform::Error* error)
 {
-    std::int32_t status = kStatusOK;
-    auto opened = AudioFile::openToRead(*fileLocation(path), &status);
-    requireOpen(status, path);
+    std::int32_t status = kStatusParameterError;
+    auto opened = url != nullptr ? AudioFile::openToRead(*url, &status) : nullptr;
+    if (!hasOpened(status, error))
+        return std::nullopt;
     VireoLoopChunksManager manager(std::move(opened));
     AudioFile& file = *manager.audioFile();
-    LoopTags tags;
+    std::optional<LoopTags> read(std::in_place);
+    LoopTags& tags = *read;
     tags.fileType = manager.audioFileTypeID();
     const bool holdsLoopChunks = tags.fileType == kAIFF || tags.fileType == kCaff;
-    if (tags.fileType == fourCC("NeXT"))
-        throw OtherKind("is an AU file; those hold no tags", OtherKind::Kind::audio);
-    readLength(file, path, tags);
+    if (tags.fileType == fourCC("NeXT")) {
+        failWith(error, LoopTagsError::otherFile, "is an AU file; those hold no tags");
+        return std::nullopt;
+    }
+    readLength(file, url, tags);
     if (holdsLoopChunks)
         readLoopChunks(manager, tags);
     if (withSamplers || !holdsLoopChunks) {
         SamplerTags sampler;
-        requireOK(SamplerTags::read(file, sampler));
+        if (!succeeded(SamplerTags::read(file, sampler), error))
+            return std::nullopt;
         addSamplerTags(tags, std::move(sampler));
     }
-    return tags;
+    return read;
 }
 
 } // namespace
 
-VireoLoopChunksManager openLoopFile(const std::string& path, AudioFile::Permission permission, LoopFiles kinds)
+std::optional<VireoLoopChunksManager> openLoopFile(const platform::URLRef& file, AudioFile::Permission permission,
+                                                   LoopFiles kinds, platform::Error* error)
 {
-    VireoLoopChunksManager manager(fileLocation(path), permission);
-    requireOpen(manager.status(), path);
-    const FourCC type = manager.audioFileTypeID();
-    if (type != kAIFF && type != kCaff && (type != kWAVE || kinds != LoopFiles::waveToo))
-        throw OtherKind(fmt::format("is {} {} file; loop tags are put into AIFF, CAF and WAVE files only",
-                                    type == kAIFC ? "an" : "a", loopContainerName(type)),
-                        OtherKind::Kind::audio);
-    return manager;
+    std::optional<VireoLoopChunksManager> manager(std::in_place, file, permission);
+    if (!hasOpened(manager->status(), error))
+        return std::nullopt;
+    const FourCC type = manager->audioFileTypeID();
+    if (type == kAIFF || type == kCaff || (type == kWAVE && kinds == LoopFiles::waveToo))
+        return manager;
+    failWith(error, LoopTagsError::otherFile,
+             std::string(type == kAIFC ? "is an " : "is a ") + loopContainerName(type) +
+                 " file; loop tags are put into AIFF, CAF and WAVE files only");
+    return std::nullopt;
 }
 
 std::vector<LoopTags::Chunk> loopChunksOf(VireoLoopChunksManager& manager)
@@ -161,7 +162,7 @@ std::vector<LoopTags::Chunk> loopChunksOf(VireoLoopChunksManager& manager)
     for (const std::unique_ptr<VireoLoopBaseChunk>& chunk : VireoLoopChunks::Empty())
         if (chunk->aifChunkID() == tagging::kBasicTagging || chunk->aifChunkID() == tagging::kTransients)
             if (const auto size = sizeOf(*chunk, file, manager.audioFileTypeID()))
-                found.push_back({carriedChunkName(*chunk), *size});
+                found.push_back({carriedLoopChunkName(*chunk), *size});
     std::uint32_t size = 0;
     for (const FourCC id : {tagging::kCategories, fourCC("NAME"), fourCC("AUTH"), fourCC("(c) "), fourCC("COMT")})
         if (aiff && file.userDataSize(id, 0, size) == kStatusOK)
@@ -174,14 +175,14 @@ std::vector<LoopTags::Chunk> loopChunksOf(VireoLoopChunksManager& manager)
     return found;
 }
 
-LoopTags readLoopTags(const std::string& path)
+std::optional<LoopTags> readLoopTags(const platform::URLRef& file, platform::Error* error)
 {
-    return readTags(path, true);
+    return readTags(file, true, error);
 }
 
-LoopTags readOwnLoopTags(const std::string& path)
+std::optional<LoopTags> readOwnLoopTags(const platform::URLRef& file, platform::Error* error)
 {
-    return readTags(path, false);
+    return readTags(file, false, error);
 }
 
 void addSamplerTags(LoopTags& tags, SamplerTags sampler)

@@ -1,11 +1,10 @@
-// ktfiles tags set, and remove: the same edit, with values and without.
+#include "loops/tags/LoopTagsSetting.h"
+
+#include "loops/VireoLoopTerms.h"
+#include "loops/tags/LoopTagsError.h"
+#include "loops/tags/LoopTagsLayouts.h"
 #include "media/containers/ContainerHeaders.h"
-#include "tool/shared/arguments/CommandLine.h"
-#include "tool/shared/looptags/LoopTagArguments.h"
-#include "tool/shared/looptags/LoopTagsEdit.h"
-#include "tool/shared/looptags/LoopTagsPatch.h"
-#include "tool/shared/output/Failure.h"
-#include "tool/tags/TagsCommand.h"
+#include "platform/String.h"
 
 #include <algorithm>
 #include <limits>
@@ -15,10 +14,86 @@ using platform::Value;
 
 namespace {
 
-bool isAssigned(const std::vector<TagAssignment>& assignments, const TagField& field)
+bool isText(const Value& value)
 {
-    return std::any_of(assignments.begin(), assignments.end(),
-                       [&](const TagAssignment& assignment) { return assignment.field == &field; });
+    const auto* const text = value.get<std::string>();
+    return text != nullptr && platform::String::fromUTF8(*text);
+}
+
+// The word that stands for a number of a field.
+std::optional<std::int64_t> numberOfWord(const LoopTagField& field, std::string_view word)
+{
+    const std::string_view name = field.name;
+    return name == "midiRootNote" ? VireoLoopNoteNamed(word)
+           : name == "keyType"    ? VireoLoopModeNamed(word)
+                                  : std::nullopt;
+}
+
+// A frame, or a frame with its type.
+std::optional<VireoLoopTransient> transientOf(const Value& value)
+{
+    constexpr std::int32_t usual = 1; // the type whose meaning is known
+    const auto* const typed = value.get<platform::Array>();
+    if (typed != nullptr && typed->size() != 2)
+        return std::nullopt;
+    const auto* const frame = (typed != nullptr ? typed->front() : value).get<std::int64_t>();
+    const auto* const type = typed != nullptr ? typed->back().get<std::int64_t>() : nullptr;
+    if (frame == nullptr || *frame < 0 || (typed != nullptr && type == nullptr))
+        return std::nullopt;
+    if (type != nullptr &&
+        (*type < std::numeric_limits<std::int16_t>::min() || *type > std::numeric_limits<std::uint16_t>::max()))
+        return std::nullopt;
+    return VireoLoopTransient(type != nullptr ? static_cast<std::int32_t>(*type) : usual,
+                              static_cast<std::uint64_t>(*frame));
+}
+
+// Each frame above the one before.
+bool areTransients(const platform::Array& list)
+{
+    std::optional<std::uint64_t> last;
+    for (const Value& each : list) {
+        const auto transient = transientOf(each);
+        if (!transient || (last && transient->frame() <= *last))
+            return false;
+        last = transient->frame();
+    }
+    return true;
+}
+
+bool isPossible(const LoopTagAssignment& assignment)
+{
+    const LoopTagField& field = *assignment.field;
+    const Value& value = assignment.value;
+    const auto* const number = value.get<std::int64_t>();
+    const auto* const list = value.get<platform::Array>();
+    if (value.isNull())
+        return true;
+    switch (field.kind) {
+    case LoopTagField::Kind::number:
+        return number != nullptr && *number >= field.least && *number <= field.most;
+    case LoopTagField::Kind::text:
+        return isText(value);
+    case LoopTagField::Kind::list:
+        return list != nullptr && std::ranges::all_of(*list, isText);
+    case LoopTagField::Kind::transients:
+        return list != nullptr && areTransients(*list);
+    }
+    return false;
+}
+
+bool failForValue(platform::Error* error, const LoopTagField& field)
+{
+    static constexpr const char* expected[] = {"a whole number from ", "a text in UTF-8", "a list of texts in UTF-8",
+                                               "a list of sample frames, each once"};
+    std::string text = std::string(field.name) + ": expected " + expected[static_cast<std::size_t>(field.kind)];
+    if (field.kind == LoopTagField::Kind::number)
+        text += std::to_string(field.least) + " to " + std::to_string(field.most);
+    return failWith(error, LoopTagsError::badValue, std::move(text));
+}
+
+bool isAssigned(std::span<const LoopTagAssignment> assignments, const LoopTagField& field)
+{
+    return std::ranges::find(assignments, &field, &LoopTagAssignment::field) != assignments.end();
 }
 
 std::string inWords(const Value& value)
@@ -26,7 +101,7 @@ std::string inWords(const Value& value)
     if (const auto* number = value.get<std::int64_t>())
         return std::to_string(*number);
     if (const auto* text = value.get<std::string>())
-        return printable(*text);
+        return *text;
     std::string joined;
     if (const auto* list = value.get<platform::Array>())
         for (const Value& each : *list)
@@ -49,216 +124,209 @@ std::vector<VireoLoopTransient> transientsAt(const Value& frames, const LoopTags
     std::map<std::uint64_t, std::int32_t> types;
     for (const VireoLoopTransient& transient : before.transients)
         types.emplace(transient.frame(), transient.transientType());
-    constexpr std::int32_t usual = 1; // the one whose meaning is known
     for (const Value& each : *list) {
-        const auto* const typed = each.get<platform::Array>();
-        const auto frame = static_cast<std::uint64_t>(*(typed != nullptr ? typed->front() : each).get<std::int64_t>());
-        const auto old = types.find(frame);
-        transients.emplace_back(typed != nullptr     ? static_cast<std::int32_t>(*typed->back().get<std::int64_t>())
-                                : old == types.end() ? usual
-                                                     : old->second,
-                                frame);
+        VireoLoopTransient& transient = transients.emplace_back(*transientOf(each));
+        const auto old = types.find(transient.frame());
+        if (each.get<platform::Array>() == nullptr && old != types.end())
+            transient.setTransientType(old->second);
     }
     return transients;
 }
 
-void refuseTransients(const std::string& path, const LoopTags& tags)
+bool canHaveTransients(const LoopTags& tags, platform::Error* error)
 {
     if (tags.transients.empty())
-        return;
+        return true;
+    constexpr std::uint64_t most = std::numeric_limits<std::uint32_t>::max();
     const std::uint64_t last = tags.transients.back().frame();
+    const std::string where = "a transient at frame " + std::to_string(last) + ", but ";
     if (tags.frames > 0 && last > tags.frames)
-        throw UsageError(fmt::format("{}: a transient at frame {}, but the file ends at frame {}", printable(path),
-                                     last, tags.frames));
-    if (tags.fileType == kAIFF && last > std::numeric_limits<std::uint32_t>::max())
-        throw UsageError(fmt::format("{}: a transient at frame {}, but an AIFF file counts no further than {}",
-                                     printable(path), last, std::numeric_limits<std::uint32_t>::max()));
+        return failWith(error, LoopTagsError::cannotKeep,
+                        where + "the file ends at frame " + std::to_string(tags.frames));
+    return tags.fileType != kAIFF || last <= most ||
+           failWith(error, LoopTagsError::cannotKeep,
+                    where + "an AIFF file counts no further than " + std::to_string(most));
 }
 
 // Beats make a loop of a file that does not say what it is.
-void makeLoopOfBeats(const LoopTags& before, std::vector<TagAssignment>& assignments)
+void makeLoopOfBeats(const LoopTags& before, std::vector<LoopTagAssignment>& assignments)
 {
     const char* const type = VireoLoopCombinedTagsChunkDataFileTypeKey;
     const auto named = [&](const char* key) {
-        return std::ranges::find_if(assignments, [&](const TagAssignment& each) {
+        return std::ranges::find_if(assignments, [&](const LoopTagAssignment& each) {
             return each.field->key != nullptr && each.field->key == std::string_view(key);
         });
     };
     const auto beats = named(VireoLoopCombinedTagsChunkDataBeatCountKey);
-    if (beats != assignments.end() && !isAbsent(beats->value) && named(type) == assignments.end() &&
-        before.fileType == kAIFF && isAbsent(valueUnder(before.combined, type))) {
-        assignments.push_back({fieldsForKey("loopFileType").front(), {}});
+    if (beats != assignments.end() && !isAbsentLoopTag(beats->value) && named(type) == assignments.end() &&
+        before.fileType == kAIFF && isAbsentLoopTag(loopValueUnder(before.combined, type))) {
+        assignments.push_back({loopTagFieldsForKey("loopFileType").front(), {}});
         assignments.back().value = 1; // g++ 12 warns, wrongly, of a value that is moved into the list
     }
 }
 
-// A tag that was asked for and cannot be kept is a mistake on the command line; one that would be lost on the way makes
-// the edit fail.
-void refuseLosses(const std::string& path, const Dictionary& wanted, const Dictionary& kept, FourCC fileType,
-                  const std::vector<TagAssignment>& assignments)
+// Whether the tags are read back as they are wanted; those of a CAF file follow in part from others.
+bool areKept(const Dictionary& wanted, const Dictionary& kept, FourCC fileType,
+             std::span<const LoopTagAssignment> assignments, platform::Error* error)
 {
-    for (const TagField& field : tagFields()) {
+    for (const LoopTagField& field : loopTagFields()) {
         if (field.key == nullptr || field.isFileInfo)
             continue;
-        const Value want = valueUnder(wanted, field.key), have = valueUnder(kept, field.key);
-        if (want == have || (isAbsent(want) && isAbsent(have)))
+        const Value want = loopValueUnder(wanted, field.key), have = loopValueUnder(kept, field.key);
+        if (want == have || (isAbsentLoopTag(want) && isAbsentLoopTag(have)))
             continue;
-        const bool assigned = isAssigned(assignments, field);
-        const std::string text = fmt::format("{} cannot keep {}={} here: it would be read as {}",
-                                             containerPhrase(fileType), field.name, inWords(want), inWords(have));
-        if (assigned)
-            throw UsageError(printable(path) + ": " + text);
+        const std::string text = containerPhrase(fileType) + " cannot keep " + field.name + "=" + inWords(want) +
+                                 " here: it would be read as " + inWords(have);
+        if (isAssigned(assignments, field))
+            return failWith(error, LoopTagsError::cannotKeep, text);
         if (fileType != kCaff || field.key != std::string_view(VireoLoopCombinedTagsChunkDataFileTypeKey))
-            throw Failure(text + "; set or remove it as well");
+            return failWith(error, LoopTagsError::wouldLose, text + "; set or remove it as well");
     }
+    return true;
 }
 
-void refuseLostTexts(const std::string& path, const LoopTags& after, const std::vector<TagAssignment>& assignments)
+bool areTextsKept(const LoopTags& after, std::span<const LoopTagAssignment> assignments, platform::Error* error)
 {
     for (const auto& [field, value] : assignments)
-        if (field->isFileInfo && !isAbsent(value) && valueUnder(after.info, field->key) != value)
-            throw UsageError(fmt::format("{}: {} cannot keep {} that long", printable(path),
-                                         containerPhrase(after.fileType), field->name));
+        if (field->isFileInfo && !isAbsentLoopTag(value) && loopValueUnder(after.info, field->key) != value)
+            return failWith(error, LoopTagsError::cannotKeep,
+                            containerPhrase(after.fileType) + " cannot keep " + field->name + " that long");
+    return true;
 }
 
 // What goes or is replaced though the library could not read it is told as well.
-void tellOfUnreadable(const RawLoopTags& before, const std::vector<TagAssignment>& assignments, TagsPlan& plan)
+void tellOfUnreadable(const RawLoopTags& before, const std::vector<LoopTagAssignment>& assignments, LoopTagsPlan& plan)
 {
-    for (const TagAssignment& assignment : assignments) {
-        const TagField& field = *assignment.field;
+    for (const LoopTagAssignment& assignment : assignments) {
+        const LoopTagField& field = *assignment.field;
         RawLoopTags alone = before;
-        assignTags(alone, {&assignment, 1});
-        if (field.kind == TagField::Kind::transients && isAbsent(assignment.value))
+        assignLoopTags(alone, {&assignment, 1});
+        if (field.kind == LoopTagField::Kind::transients && isAbsentLoopTag(assignment.value))
             alone.transients.reset();
         // A signature is one thing.
         if (alone == before || field.name == std::string_view("signatureBottom") ||
-            std::ranges::any_of(plan.changes, [&](const TagChange& change) { return change.key == field.name; }))
+            std::ranges::any_of(plan.changes, [&](const LoopTagChange& change) { return change.key == field.name; }))
             continue;
         plan.changes.push_back({field.name, "other bytes", {}});
-        if (!isAbsent(assignment.value))
+        if (!isAbsentLoopTag(assignment.value))
             plan.changes.back().to = inWords(assignment.value);
     }
 }
 
-void refuseOtherKinds(const LoopTags& tags)
+bool canBeSet(const LoopTags& tags, platform::Error* error)
 {
-    if (tags.fileType != kAIFF && tags.fileType != kCaff)
-        throw Failure(fmt::format("is {} {} file; tags are set and removed in AIFF and CAF files only",
-                                  tags.fileType == kAIFC ? "an" : "a", loopContainerName(tags.fileType)));
+    return tags.fileType == kAIFF || tags.fileType == kCaff ||
+           failWith(error, LoopTagsError::otherFile,
+                    std::string(tags.fileType == kAIFC ? "is an " : "is a ") + loopContainerName(tags.fileType) +
+                        " file; tags are set and removed in AIFF and CAF files only");
 }
 
-TagsPlan planAssignments(const LoopTags& before, const std::string& path, std::vector<TagAssignment> assignments)
+std::optional<RawLoopTags> bytesOf(const platform::URLRef& file, platform::Error* error)
 {
-    refuseOtherKinds(before);
-    VireoLoopChunksManager manager = openLoopFile(path, platform::AudioFile::Permission::read);
-    const RawLoopTags bytes = readRawLoopTags(manager);
-    TagsPlan plan;
-    plan.after = before;
-    plan.bytes = bytes;
-    makeLoopOfBeats(before, assignments);
-    assignTags(plan.bytes, assignments);
-    Dictionary wanted = before.combined;
-    for (const auto& [field, value] : assignments)
-        if (field->kind == TagField::Kind::transients)
-            plan.after.transients = transientsAt(value, before);
-        else if (!field->isFileInfo && isAbsent(value))
-            wanted.erase(field->key);
-        else if (!field->isFileInfo)
-            wanted[field->key] = value;
-    plan.after.combined = combinedTagsOf(plan.bytes);
-    plan.after.info = infoTextsOf(plan.bytes);
-    refuseLosses(path, wanted, plan.after.combined, before.fileType, assignments);
-    refuseLostTexts(path, plan.after, assignments);
-    const bool namesTransients = std::ranges::any_of(
-        assignments, [](const auto& each) { return each.field->kind == TagField::Kind::transients; });
-    if (namesTransients && (plan.after.transients != before.transients || plan.after.transients.empty())) {
-        refuseTransients(path, plan.after);
-        assignTransients(plan.bytes, plan.after.transients);
-    }
-    plan.changes = differences(before, plan.after);
-    tellOfUnreadable(bytes, assignments, plan);
-    plan.write = [bytes, after = plan.bytes](VireoLoopChunksManager& file) {
-        return writeRawLoopTags(file, bytes, after);
-    };
-    return plan;
-}
-
-TagsPlan planRemoval(const LoopTags& before, const std::string& path)
-{
-    refuseOtherKinds(before);
-    TagsPlan plan;
-    plan.after.fileType = before.fileType;
-    plan.after.sampleRate = before.sampleRate;
-    plan.after.frames = before.frames;
-    plan.changes = differences(before, plan.after);
-    VireoLoopChunksManager manager = openLoopFile(path, platform::AudioFile::Permission::read);
-    const RawLoopTags bytes = readRawLoopTags(manager);
-    plan.bytes.fileType = before.fileType;
-    if (before.fileType == kCaff) { // the other texts of "info" stay as they are
-        plan.bytes.texts = bytes.texts;
-        for (const TagField& field : tagFields())
-            if (const TagAssignment removal{&field, {}}; field.isFileInfo)
-                assignTags(plan.bytes, {&removal, 1});
-    }
-    if (plan.changes.empty()) { // chunks that say nothing, or that cannot be read
-        for (const LoopTags::Chunk& chunk : loopChunksOf(manager))
-            plan.changes.push_back({chunk.id, fmt::format("{} bytes", chunk.size), {}});
-    }
-    plan.write = [bytes, after = plan.bytes](VireoLoopChunksManager& file) {
-        return writeRawLoopTags(file, bytes, after) && file.removeChunks(VireoLoopChunks::Empty());
-    };
-    return plan;
-}
-
-struct SetArguments {
-    std::vector<std::string> words;
-    FileArguments files; // those of the list; the others are among the words
-    EditOptions options;
-};
-
-bool runSet(SetArguments& arguments, const OutputOptions& output)
-{
-    const TagArguments parsed = parseAssignments(arguments.words);
-    arguments.files.names = parsed.files;
-    const TagsEditor editor{"set", "set", "would set", [&](const LoopTags& before, const std::string& path) {
-                                return planAssignments(before, path, parsed.assignments);
-                            }};
-    return editTags(arguments.files, editor, arguments.options, output);
-}
-
-bool runRemove(SetArguments& arguments, const OutputOptions& output)
-{
-    const TagArguments parsed = parseKeys(arguments.words);
-    arguments.files.names = parsed.files;
-    const TagsEditor editor{"remove", "removed", "would remove", [&](const LoopTags& before, const std::string& path) {
-                                return parsed.assignments.empty() ? planRemoval(before, path)
-                                                                  : planAssignments(before, path, parsed.assignments);
-                            }};
-    return editTags(arguments.files, editor, arguments.options, output);
-}
-
-void declareEdit(CommandLine& commandLine, Verb& tags, const std::string& name, const std::string& description,
-                 const std::string& words, SetArguments& arguments, bool (*run)(SetArguments&, const OutputOptions&))
-{
-    Verb& verb = commandLine.addVerb(
-        name, description, [&commandLine, &arguments, run] { return run(arguments, commandLine.output()); }, &tags);
-    CommandLine::addFiles(verb, arguments.words).describe(words);
-    CommandLine::addFileList(verb, arguments.files);
-    CommandLine::addEditOptions(verb, arguments.options);
+    auto manager = openLoopFile(file, platform::AudioFile::Permission::read, LoopFiles::withLoopChunks, error);
+    return manager ? readRawLoopTags(*manager, error) : std::nullopt;
 }
 
 } // namespace
 
-void declareTagsSet(CommandLine& commandLine, Verb& tags)
+std::optional<LoopTagAssignment> loopTagAssignment(std::string_view name, platform::Value value, platform::Error* error)
 {
-    static SetArguments toSet;
-    declareEdit(commandLine, tags, "set", "Set tags; what is not named stays",
-                "The audio files, and KEY=VALUE for each tag, as in genre=Jazz, key=F#, signature=4/4", toSet, runSet);
+    const auto field = std::ranges::find(loopTagFields(), name, [](const LoopTagField& each) { return each.name; });
+    if (field == loopTagFields().end()) {
+        failWith(error, LoopTagsError::badValue, "there is no tag \"" + std::string(name) + "\"");
+        return std::nullopt;
+    }
+    LoopTagAssignment assignment{&*field, std::move(value)};
+    if (const auto* const word = assignment.value.get<std::string>())
+        if (const auto number = numberOfWord(*field, *word))
+            assignment.value = *number;
+    if (auto* const list = assignment.value.get<platform::Array>(); list != nullptr && field->key == nullptr)
+        std::ranges::stable_sort(*list, {}, [](const Value& each) {
+            const auto transient = transientOf(each);
+            return transient ? transient->frame() : 0;
+        });
+    if (isPossible(assignment))
+        return assignment;
+    failForValue(error, *field);
+    return std::nullopt;
 }
 
-void declareTagsRemove(CommandLine& commandLine, Verb& tags)
+std::optional<LoopTagsPlan> planLoopTagAssignments(const LoopTags& before, const platform::URLRef& file,
+                                                   std::span<const LoopTagAssignment> wantedOnes,
+                                                   platform::Error* error)
 {
-    static SetArguments toRemove;
-    declareEdit(commandLine, tags, "remove", "Remove tags, or without keys everything that makes a loop",
-                "The audio files, and the KEYs of the tags to remove", toRemove, runRemove);
+    std::vector<LoopTagAssignment> assignments(wantedOnes.begin(), wantedOnes.end());
+    for (const LoopTagAssignment& assignment : assignments)
+        if (!isPossible(assignment)) {
+            failForValue(error, *assignment.field);
+            return std::nullopt;
+        }
+    auto bytes = canBeSet(before, error) ? bytesOf(file, error) : std::nullopt;
+    if (!bytes)
+        return std::nullopt;
+    std::optional<LoopTagsPlan> planned(std::in_place);
+    LoopTagsPlan& plan = *planned;
+    plan.after = before;
+    plan.bytes = *bytes;
+    makeLoopOfBeats(before, assignments);
+    if (!assignLoopTags(plan.bytes, assignments, error))
+        return std::nullopt;
+    Dictionary wanted = before.combined;
+    for (const auto& [field, value] : assignments)
+        if (field->kind == LoopTagField::Kind::transients)
+            plan.after.transients = transientsAt(value, before);
+        else if (!field->isFileInfo && isAbsentLoopTag(value))
+            wanted.erase(field->key);
+        else if (!field->isFileInfo)
+            wanted[field->key] = value;
+    plan.after.combined = combinedLoopTagsOf(plan.bytes);
+    plan.after.info = loopTextsOf(plan.bytes);
+    if (!areKept(wanted, plan.after.combined, before.fileType, assignments, error) ||
+        !areTextsKept(plan.after, assignments, error))
+        return std::nullopt;
+    const bool namesTransients = std::ranges::any_of(
+        assignments, [](const auto& each) { return each.field->kind == LoopTagField::Kind::transients; });
+    if (namesTransients && (plan.after.transients != before.transients || plan.after.transients.empty())) {
+        if (!canHaveTransients(plan.after, error))
+            return std::nullopt;
+        assignLoopTransients(plan.bytes, plan.after.transients);
+    }
+    plan.changes = loopTagDifferences(before, plan.after);
+    tellOfUnreadable(*bytes, assignments, plan);
+    plan.write = [was = std::move(*bytes), after = plan.bytes](VireoLoopChunksManager& manager) {
+        return writeRawLoopTags(manager, was, after);
+    };
+    return planned;
+}
+
+std::optional<LoopTagsPlan> planLoopTagsRemoval(const LoopTags& before, const platform::URLRef& file,
+                                                platform::Error* error)
+{
+    auto manager = canBeSet(before, error)
+                       ? openLoopFile(file, platform::AudioFile::Permission::read, LoopFiles::withLoopChunks, error)
+                       : std::nullopt;
+    auto bytes = manager ? readRawLoopTags(*manager, error) : std::nullopt;
+    if (!bytes)
+        return std::nullopt;
+    std::optional<LoopTagsPlan> planned(std::in_place);
+    LoopTagsPlan& plan = *planned;
+    plan.after.fileType = before.fileType;
+    plan.after.sampleRate = before.sampleRate;
+    plan.after.frames = before.frames;
+    plan.changes = loopTagDifferences(before, plan.after);
+    plan.bytes.fileType = before.fileType;
+    if (before.fileType == kCaff) { // the other texts of "info" stay as they are
+        plan.bytes.texts = bytes->texts;
+        for (const LoopTagField& field : loopTagFields())
+            if (const LoopTagAssignment removal{&field, {}}; field.isFileInfo)
+                assignLoopTags(plan.bytes, {&removal, 1});
+    }
+    if (plan.changes.empty()) { // chunks that say nothing, or that cannot be read
+        for (const LoopTags::Chunk& chunk : loopChunksOf(*manager))
+            plan.changes.push_back({chunk.id, std::to_string(chunk.size) + " bytes", {}});
+    }
+    plan.write = [was = std::move(*bytes), after = plan.bytes](VireoLoopChunksManager& open) {
+        return writeRawLoopTags(open, was, after) && open.removeChunks(VireoLoopChunks::Empty());
+    };
+    return planned;
 }

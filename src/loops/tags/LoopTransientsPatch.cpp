@@ -1,7 +1,7 @@
 // The transients' side of LoopTagsPatch.
 #include "loops/tagging/Chunks.h"
+#include "loops/tags/LoopTagsPatch.h"
 #include "media/containers/ContainerHeaders.h"
-#include "tool/shared/looptags/LoopTagsPatch.h"
 
 #include <algorithm>
 #include <cstring>
@@ -79,12 +79,12 @@ void setTime(Bytes& chunk, const Layout& layout)
 
 } // namespace
 
-void assignTransients(RawLoopTags& tags, const std::vector<VireoLoopTransient>& transients)
+void assignLoopTransients(RawLoopTags& tags, const std::vector<VireoLoopTransient>& transients)
 {
     const Layout& layout = layoutOf(tags.fileType);
     Bytes old = canBeRead(tags) ? *tags.transients : Bytes(layout.headSize);
     if (!canBeRead(tags))
-        storeBE(old.data() + layout.versionAt, TransientFields().version);
+        storeBE(old.data() + layout.versionAt, LoopTransientFields().version);
     const auto room = static_cast<std::int64_t>((old.size() - layout.headSize) / layout.recordSize);
     const std::int64_t claimed = std::max<std::int64_t>(layout.count(old), 0);
     const auto records = static_cast<std::size_t>(std::min(claimed, room));
@@ -113,16 +113,16 @@ void assignTransients(RawLoopTags& tags, const std::vector<VireoLoopTransient>& 
         tags.transients = std::move(bytes);
 }
 
-std::optional<TransientFields> transientFieldsOf(const RawLoopTags& tags)
+std::optional<LoopTransientFields> loopTransientFieldsOf(const RawLoopTags& tags)
 {
     if (!canBeRead(tags))
         return std::nullopt;
     const Layout& layout = layoutOf(tags.fileType);
     const auto at = [&](std::size_t offset) { return loadBE<std::uint16_t>(tags.transients->data() + offset); };
-    return TransientFields{at(layout.versionAt), at(layout.detectionAt), at(layout.divisionAt)};
+    return LoopTransientFields{at(layout.versionAt), at(layout.detectionAt), at(layout.divisionAt)};
 }
 
-void assignTransientFields(RawLoopTags& tags, const TransientFields& fields)
+void assignLoopTransientFields(RawLoopTags& tags, const LoopTransientFields& fields)
 {
     const Layout& layout = layoutOf(tags.fileType);
     const auto set = [&](std::size_t offset, std::uint16_t value) { storeBE(tags.transients->data() + offset, value); };

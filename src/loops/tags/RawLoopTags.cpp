@@ -1,10 +1,9 @@
-#include "tool/shared/looptags/RawLoopTags.h"
+#include "loops/tags/RawLoopTags.h"
 
 #include "loops/VireoLoopCombinedTagsChunkData.h"
 #include "loops/VireoLoopUserDataUtils.h"
+#include "loops/tags/LoopTagsError.h"
 #include "media/containers/ContainerHeaders.h"
-#include "platform/core/Status.h"
-#include "tool/shared/output/Failure.h"
 
 #include <algorithm>
 
@@ -14,41 +13,51 @@ namespace {
 
 constexpr FourCC kInfoChunk = fourCC("info");
 
-// The item at an index; none when there is none. What cannot be read is no item that is not there.
-std::optional<Bytes> item(AudioFile& file, FourCC type, std::uint32_t index)
+// The item at an index, if there is one. False for what cannot be read, which is no item that is not there.
+bool readItem(AudioFile& file, FourCC type, std::uint32_t index, std::optional<Bytes>& item, platform::Error* error)
 {
     std::uint32_t size = 0;
     const std::int32_t status = file.userDataSize(type, index, size);
     if (status == kStatusParameterError)
-        return std::nullopt;
-    requireOK(status);
+        return true;
+    if (!succeeded(status, error))
+        return false;
     Bytes bytes(size);
-    requireOK(file.userData(type, index, size, bytes.data()));
+    if (!succeeded(file.userData(type, index, size, bytes.data()), error))
+        return false;
     bytes.resize(size);
-    return bytes;
+    item = std::move(bytes);
+    return true;
 }
 
 // The same of a CAF file's "uuid" items, without the UUID.
-std::optional<Bytes> itemWithUUID(AudioFile& file, const tagging::UUIDBytes& uuid)
+bool readItemWithUUID(AudioFile& file, const tagging::UUIDBytes& uuid, std::optional<Bytes>& item,
+                      platform::Error* error)
 {
     std::uint32_t count = 0;
-    requireOK(file.countUserData(tagging::kCAFUUIDChunk, count));
+    if (!succeeded(file.countUserData(tagging::kCAFUUIDChunk, count), error))
+        return false;
     for (std::uint32_t index = 0; index < count; ++index) {
         tagging::UUIDBytes found{};
         std::uint32_t size = sizeof found;
-        requireOK(file.userData(tagging::kCAFUUIDChunk, index, size, found));
+        if (!succeeded(file.userData(tagging::kCAFUUIDChunk, index, size, found), error))
+            return false;
         if (size < sizeof found || !std::ranges::equal(found, uuid))
             continue;
-        Bytes bytes = item(file, tagging::kCAFUUIDChunk, index).value_or(Bytes());
-        bytes.erase(bytes.begin(), bytes.begin() + std::min<std::ptrdiff_t>(sizeof uuid, std::ssize(bytes)));
-        return bytes;
+        if (!readItem(file, tagging::kCAFUUIDChunk, index, item, error))
+            return false;
+        if (!item)
+            item.emplace();
+        item->erase(item->begin(), item->begin() + std::min<std::ptrdiff_t>(sizeof uuid, std::ssize(*item)));
+        return true;
     }
-    return std::nullopt;
+    return true;
 }
 
-std::optional<Bytes> loopChunk(AudioFile& file, FourCC id)
+bool readLoopChunk(AudioFile& file, FourCC id, std::optional<Bytes>& chunk, platform::Error* error)
 {
-    return file.fileType() == kAIFF ? item(file, id, 0) : itemWithUUID(file, *chunkIDToCafChunkUUID(id));
+    return file.fileType() == kAIFF ? readItem(file, id, 0, chunk, error)
+                                    : readItemWithUUID(file, *chunkIDToCafChunkUUID(id), chunk, error);
 }
 
 bool writeItem(AudioFile& file, FourCC id, const std::optional<Bytes>& before, const std::optional<Bytes>& after)
@@ -81,20 +90,23 @@ std::vector<FourCC> textIDs(FourCC fileType)
 
 } // namespace
 
-RawLoopTags readRawLoopTags(VireoLoopChunksManager& manager)
+std::optional<RawLoopTags> readRawLoopTags(VireoLoopChunksManager& manager, platform::Error* error)
 {
     AudioFile& file = *manager.audioFile();
     RawLoopTags tags;
     tags.fileType = file.fileType();
-    if (tags.fileType != kWAVE) {
-        tags.basic = loopChunk(file, tagging::kBasicTagging);
-        tags.transients = loopChunk(file, tagging::kTransients);
-    }
-    if (tags.fileType == kAIFF)
-        tags.categories = loopChunk(file, tagging::kCategories);
-    for (const FourCC id : textIDs(tags.fileType))
-        if (auto text = item(file, id, 0))
+    if (tags.fileType != kWAVE && (!readLoopChunk(file, tagging::kBasicTagging, tags.basic, error) ||
+                                   !readLoopChunk(file, tagging::kTransients, tags.transients, error)))
+        return std::nullopt;
+    if (tags.fileType == kAIFF && !readLoopChunk(file, tagging::kCategories, tags.categories, error))
+        return std::nullopt;
+    for (const FourCC id : textIDs(tags.fileType)) {
+        std::optional<Bytes> text;
+        if (!readItem(file, id, 0, text, error))
+            return std::nullopt;
+        if (text)
             tags.texts[id] = std::move(*text);
+    }
     return tags;
 }
 
@@ -109,7 +121,7 @@ bool writeRawLoopTags(VireoLoopChunksManager& manager, const RawLoopTags& before
     return good;
 }
 
-platform::Dictionary combinedTagsOf(const RawLoopTags& tags)
+platform::Dictionary combinedLoopTagsOf(const RawLoopTags& tags)
 {
     VireoLoopCombinedTagsChunkData data;
     if (tags.fileType == kAIFF && (tags.basic || tags.categories)) {

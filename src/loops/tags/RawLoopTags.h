@@ -3,6 +3,7 @@
 #pragma once
 
 #include "loops/VireoLoopChunksManager.h"
+#include "platform/core/Error.h"
 #include "platform/core/Value.h"
 
 #include <map>
@@ -19,11 +20,11 @@ struct RawLoopTags {
     friend bool operator==(const RawLoopTags&, const RawLoopTags&) = default;
 };
 
-/// Throws Failure.
-RawLoopTags readRawLoopTags(VireoLoopChunksManager& manager);
+/// None when something of it cannot be read.
+KT_EXPORT std::optional<RawLoopTags> readRawLoopTags(VireoLoopChunksManager& manager, platform::Error* error = nullptr);
 
 /// Writes the chunks that differ, and removes those that are gone; false when that failed.
-bool writeRawLoopTags(VireoLoopChunksManager& manager, const RawLoopTags& before, const RawLoopTags& after);
+KT_EXPORT bool writeRawLoopTags(VireoLoopChunksManager& manager, const RawLoopTags& before, const RawLoopTags& after);
 
 /// The combined tags as the library reads them.
-platform::Dictionary combinedTagsOf(const RawLoopTags& tags);
+KT_EXPORT platform::Dictionary combinedLoopTagsOf(const RawLoopTags& tags);

@@ -1,15 +1,16 @@
-#include "tool/shared/looptags/WaveLoopTags.h"
+#include "loops/tags/WaveLoopTags.h"
 
 #include "audiofile/metadata/AcidChunk.h"
 #include "audiofile/metadata/SamplerChunk.h"
 #include "loops/VireoLoopTerms.h"
+#include "loops/tags/LoopTagFields.h"
+#include "loops/tags/LoopTagsError.h"
+#include "loops/tags/LoopTagsLayouts.h"
+#include "loops/tags/LoopTagsPatch.h"
 #include "media/containers/ContainerHeaders.h"
-#include "tool/shared/looptags/LoopTagFields.h"
-#include "tool/shared/looptags/LoopTagsPatch.h"
-
-#include <fmt/format.h>
 
 #include <algorithm>
+#include <charconv>
 #include <cmath>
 #include <limits>
 
@@ -19,17 +20,18 @@ constexpr FourCC kAcid = fourCC("acid");
 constexpr FourCC kSampler = fourCC("smpl");
 constexpr std::int64_t kLoop = 1, kNoLoop = 2; // of loopFileType
 
-// The chunk that is there, or a new one.
+// The chunk that is there, or a new one; none of one that is cut short.
 template <class Chunk>
-Chunk chunkIn(const RawLoopTags& tags, FourCC id, const Chunk& fresh)
+std::optional<Chunk> chunkIn(const RawLoopTags& tags, FourCC id, const Chunk& fresh, platform::Error* error)
 {
     const auto found = tags.texts.find(id);
     if (found == tags.texts.end())
         return fresh;
     auto chunk = Chunk::read(found->second);
     if (!chunk)
-        throw Failure(fmt::format("its chunk \"{}\" is cut short; chunks remove takes it off", fourCCText(id)));
-    return *chunk;
+        failWith(error, LoopTagsError::damagedChunk,
+                 "its chunk \"" + fourCCText(id) + "\" is cut short; chunks remove takes it off");
+    return chunk;
 }
 
 std::int64_t kindOf(const LoopTags& tags)
@@ -57,7 +59,7 @@ float tempoIn(const LoopTags& source, const LoopTags& target)
     return static_cast<float>(isAsLong && source.statedTempo > 0 ? source.statedTempo : computed);
 }
 
-void assignAcid(RawLoopTags& chunks, const LoopTags& source, const LoopTags& target)
+bool assignAcid(RawLoopTags& chunks, const LoopTags& source, const LoopTags& target, platform::Error* error)
 {
     constexpr std::int64_t most = std::numeric_limits<std::uint16_t>::max();
     const std::int64_t beats = source.number(VireoLoopCombinedTagsChunkDataBeatCountKey),
@@ -68,11 +70,14 @@ void assignAcid(RawLoopTags& chunks, const LoopTags& source, const LoopTags& tar
     const bool hasRoot = root > 0 && root <= 127;
     // For a root note alone "smpl" is enough.
     if (beats <= 0 && kind == 0 && !hasSignature && (!hasRoot || !chunks.texts.contains(kAcid)))
-        return;
+        return true;
     AcidChunk fresh;
     fresh.unknown = 0x8000; // as others write it
     fresh.flags = kind == kLoop ? std::uint32_t{AcidChunk::kStretched} : 0U;
-    AcidChunk acid = chunkIn(chunks, kAcid, fresh);
+    std::optional<AcidChunk> there = chunkIn(chunks, kAcid, fresh, error);
+    if (!there)
+        return false;
+    AcidChunk& acid = *there;
     if (kind != 0)
         acid.flags = (acid.flags & ~std::uint32_t{AcidChunk::kOneShot}) |
                      (kind == kNoLoop ? std::uint32_t{AcidChunk::kOneShot} : 0U);
@@ -89,6 +94,7 @@ void assignAcid(RawLoopTags& chunks, const LoopTags& source, const LoopTags& tar
         acid.meterDenominator = static_cast<std::uint16_t>(bottom);
     }
     chunks.texts[kAcid] = acid.write();
+    return true;
 }
 
 std::vector<SamplerLoop> newLoops(const LoopTags& source, const LoopTags& target)
@@ -112,12 +118,12 @@ std::vector<SamplerLoop> newLoops(const LoopTags& source, const LoopTags& target
     return loops;
 }
 
-void assignSampler(RawLoopTags& chunks, const LoopTags& source, const LoopTags& target)
+bool assignSampler(RawLoopTags& chunks, const LoopTags& source, const LoopTags& target, platform::Error* error)
 {
     const std::int64_t root = rootOf(source);
     const bool isNew = !chunks.texts.contains(kSampler);
     if ((root <= 0 || root > 127) && (!isNew || source.sampler.loops.empty()))
-        return;
+        return true;
     constexpr std::uint32_t middleC = 60; // where nobody chose a note
     constexpr double nanoseconds = 1e9;
     SamplerChunk fresh;
@@ -126,32 +132,43 @@ void assignSampler(RawLoopTags& chunks, const LoopTags& source, const LoopTags& 
         fresh.samplePeriod = static_cast<std::uint32_t>(std::lround(nanoseconds / target.sampleRate));
     if (isNew)
         fresh.loops = newLoops(source, target);
-    SamplerChunk sampler = chunkIn(chunks, kSampler, fresh);
+    std::optional<SamplerChunk> there = chunkIn(chunks, kSampler, fresh, error);
+    if (!there)
+        return false;
+    SamplerChunk& sampler = *there;
     if (root > 0 && root <= 127)
         sampler.midiUnityNote = static_cast<std::uint32_t>(root);
     chunks.texts[kSampler] = sampler.write();
+    return true;
 }
 
-platform::Value valueOf(const LoopTags& tags, const TagField& field)
+platform::Value presentValue(const LoopTags& tags, const LoopTagField& field)
 {
     const platform::Dictionary& values = field.isFileInfo ? tags.info : tags.combined;
     const auto found = field.key != nullptr ? values.find(field.key) : values.end();
-    return found != values.end() && !isAbsent(found->second) ? found->second : platform::Value();
+    return found != values.end() && !isAbsentLoopTag(found->second) ? found->second : platform::Value();
+}
+
+std::string sixDigits(double number)
+{
+    char text[32];
+    constexpr int digits = 6;
+    return {text, std::to_chars(text, std::end(text), number, std::chars_format::general, digits).ptr};
 }
 
 } // namespace
 
-void assignWaveTags(RawLoopTags& chunks, const LoopTags& source, const LoopTags& target)
+bool assignWaveLoopTags(RawLoopTags& chunks, const LoopTags& source, const LoopTags& target, platform::Error* error)
 {
-    assignAcid(chunks, source, target);
-    assignSampler(chunks, source, target);
+    return assignAcid(chunks, source, target, error) && assignSampler(chunks, source, target, error);
 }
 
-LoopTags tagsWithWaveChunks(const std::string& path, const LoopTags& before, const RawLoopTags& chunks)
+std::optional<LoopTags> loopTagsWithWaveChunks(VireoLoopChunksManager& file, const LoopTags& before,
+                                               const RawLoopTags& chunks, platform::Error* error)
 {
-    VireoLoopChunksManager manager = openLoopFile(path, platform::AudioFile::Permission::read, LoopFiles::waveToo);
     std::vector<SamplerTagChunk> found;
-    requireOK(readSamplerTagChunks(*manager.audioFile(), found));
+    if (!succeeded(readSamplerTagChunks(*file.audioFile(), found), error))
+        return std::nullopt;
     std::erase_if(found, [](const SamplerTagChunk& chunk) { return chunk.id == kAcid || chunk.id == kSampler; });
     for (const auto& [id, body] : chunks.texts)
         found.push_back({id, body});
@@ -163,13 +180,13 @@ LoopTags tagsWithWaveChunks(const std::string& path, const LoopTags& before, con
     return after;
 }
 
-std::vector<std::string> lossesInWave(const LoopTags& source, const LoopTags& after)
+std::vector<std::string> loopTagsLostInWave(const LoopTags& source, const LoopTags& after)
 {
     std::vector<std::string> lost;
-    for (const TagField& field : tagFields()) {
-        const platform::Value value = valueOf(source, field);
+    for (const LoopTagField& field : loopTagFields()) {
+        const platform::Value value = presentValue(source, field);
         const bool isRoot = field.name == std::string_view("midiRootNote"); // in whatever octave
-        const bool isKept = isRoot ? rootOf(source) == rootOf(after) : value == valueOf(after, field);
+        const bool isKept = isRoot ? rootOf(source) == rootOf(after) : value == presentValue(after, field);
         if (!value.isNull() && !isKept && !field.isFileInfo)
             lost.emplace_back(field.name);
     }
@@ -179,8 +196,10 @@ std::vector<std::string> lossesInWave(const LoopTags& source, const LoopTags& af
         lost.push_back(chunk.id);
     if (lost.empty())
         return {};
-    return {fmt::format("{} {} not kept: \"acid\" and \"smpl\" have no room", fmt::join(lost, ", "),
-                        lost.size() == 1 ? "is" : "are")};
+    std::string names;
+    for (const std::string& name : lost)
+        names += (names.empty() ? "" : ", ") + name;
+    return {names + (lost.size() == 1 ? " is" : " are") + " not kept: \"acid\" and \"smpl\" have no room"};
 }
 
 RawLoopTags asLoopChunks(LoopTags& tags, std::vector<std::string>& notKept)
@@ -193,31 +212,31 @@ RawLoopTags asLoopChunks(LoopTags& tags, std::vector<std::string>& notKept)
         const std::int64_t note = tags.number(VireoLoopCombinedTagsChunkDataMidiRootNoteKey);
         root->second = lowest + note % octave;
         if (note != lowest + note % octave)
-            notKept.push_back(
-                fmt::format("the root note {} is kept as the key {}, {}", note, keyName(note), lowest + note % octave));
+            notKept.push_back("the root note " + std::to_string(note) + " is kept as the key " + loopKeyName(note) +
+                              ", " + std::to_string(lowest + note % octave));
     }
-    for (const TagField& field : tagFields()) {
-        const platform::Value value = valueOf(tags, field);
+    for (const LoopTagField& field : loopTagFields()) {
+        const platform::Value value = presentValue(tags, field);
         if (value.isNull())
             continue;
-        const TagAssignment assignment{&field, value};
-        assignTags(chunks, {&assignment, 1});
-        const platform::Dictionary kept = field.isFileInfo ? infoTextsOf(chunks) : combinedTagsOf(chunks);
+        const LoopTagAssignment assignment{&field, value};
+        assignLoopTags(chunks, {&assignment, 1});
+        const platform::Dictionary kept = field.isFileInfo ? loopTextsOf(chunks) : combinedLoopTagsOf(chunks);
         if (const auto found = kept.find(field.key); found == kept.end() || found->second != value)
-            notKept.push_back(fmt::format("{} is not kept whole", field.name));
+            notKept.push_back(std::string(field.name) + " is not kept whole");
     }
-    tags.combined = combinedTagsOf(chunks);
-    tags.info = infoTextsOf(chunks);
+    tags.combined = combinedLoopTagsOf(chunks);
+    tags.info = loopTextsOf(chunks);
     const double followed =
         VireoLoopTempo(tags.number(VireoLoopCombinedTagsChunkDataBeatCountKey), tags.frames, tags.sampleRate);
     constexpr double nearly = 0.005;
     if (tags.statedTempo > 0 && std::abs(followed - tags.statedTempo) > nearly * tags.statedTempo)
-        notKept.push_back(fmt::format("the tempo {:.6g} is not kept: {}", tags.statedTempo,
-                                      followed > 0 ? fmt::format("beats and length make {:.6g}", followed)
-                                                   : "the number of beats is not known"));
+        notKept.push_back("the tempo " + sixDigits(tags.statedTempo) + " is not kept: " +
+                          (followed > 0 ? "beats and length make " + sixDigits(followed)
+                                        : std::string("the number of beats is not known")));
     if (!tags.sampler.loops.empty())
         notKept.emplace_back("loop points are not kept");
     if (!tags.sampler.markers.empty())
-        notKept.emplace_back(kMarkersAreLost);
+        notKept.emplace_back(kLoopMarkersAreLost);
     return chunks;
 }

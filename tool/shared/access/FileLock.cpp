@@ -18,7 +18,7 @@ bool waitForLock(int descriptor, const std::string& path, const WaitOptions& wai
     // The lock is the open file's: had too late it goes with the last of its descriptors, which is this copy.
     const auto copy = std::make_shared<platform::OwnedDescriptor>(::fcntl(descriptor, F_DUPFD_CLOEXEC, 0));
     if (!*copy)
-        throw Failure(systemErrorText(errno));
+        throw Failure(SystemErrorText(errno));
     const auto result = std::make_shared<FileLockResult>(FileLockResult::unsupported);
     awaitOthers(
         path, wait, [&] { return lockersText(descriptor); },

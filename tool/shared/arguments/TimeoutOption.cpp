@@ -8,14 +8,14 @@
 
 namespace {
 
-constexpr double kLongestTimeout = 1e8; // three years
+constexpr double kLongestLockWait = 1e8; // three years
 
 std::optional<double> timeoutFromText(const std::string& text)
 {
     double seconds = 0;
     const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), seconds);
     const bool isNumber = error == std::errc() && end == text.data() + text.size() && std::isfinite(seconds);
-    return isNumber && seconds >= 0 && seconds <= kLongestTimeout ? std::optional(seconds) : std::nullopt;
+    return isNumber && seconds >= 0 && seconds <= kLongestLockWait ? std::optional(seconds) : std::nullopt;
 }
 
 } // namespace

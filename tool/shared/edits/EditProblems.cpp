@@ -12,134 +12,20 @@
 
 namespace {
 
+// With what the command can do about it.
 std::string sentenceOn(const FileProblem& problem)
 {
     using Kind = FileProblem::Kind;
-    const std::string why = systemErrorText(problem.systemError);
     switch (problem.kind) {
-    case Kind::none:
-        break;
-    case Kind::system:
-        return problem.systemError == ENXIO ? "not a regular file" : why;
-    case Kind::folder:
-        return "its folder: " + why;
-    case Kind::creation:
-        return "no file can be made in its folder: " + why;
-    case Kind::noFreeName:
-        return "no temporary file can be made in its folder";
-    case Kind::givenAway:
-        return "its temporary file was moved by another program; nothing was done";
-    case Kind::shortened:
-        return "became shorter while it was copied";
     case Kind::owner:
-        return fmt::format("its owner cannot be kept: {}; --in-place edits the file itself", why);
     case Kind::attribute:
-        return fmt::format("its extended attribute {} cannot be kept: {}; --in-place edits the file itself",
-                           problem.name, why);
     case Kind::hardLinks:
-        return fmt::format("has {} names (hard links), and the others would keep the old content; --in-place edits the "
-                           "file itself",
-                           problem.count);
+        return problem.Description() + "; --in-place edits the file itself";
     case Kind::sameAsBackup:
-        return problem.name + " is the same file still, left so by an edit that was cut short, and would change with "
-                              "it; an edit without --in-place keeps it as it is";
-    case Kind::backups:
-        return "has too many backups";
-    case Kind::uncommittedBackup:
-        return "its backup cannot be committed to storage: " + why;
-    case Kind::changed:
-        return "was changed by another program meanwhile; nothing was done";
-    case Kind::refused:
-        return StatusText(problem.status);
-    case Kind::uncommitted:
-        return "is edited, but a loss of power now may undo that: its folder cannot be committed to storage: " + why;
-    }
-    return "";
-}
-
-std::string addStatusText(std::int32_t status)
-{
-    switch (status) {
-    case 0:
-        return "the file is not chunk-based";
-    case -2:
-        return "its container header cannot be read";
-    case -3:
-        return "the new chunk's header cannot be written";
-    case -4:
-        return "the new chunk's body cannot be written";
-    case -5:
-        return "its container header cannot be written";
-    case -6:
-        return "is not open for writing";
-    case -7:
-        return "the chunk to replace cannot be removed";
-    case -8:
-        return "its chunks cannot be walked";
-    case -9:
-        return "the chunk is too large for the container";
-    case kStatusEndOfFile:
-        return "its container has a negative size";
+        return problem.Description() + "; an edit without --in-place keeps it as it is";
     default:
-        return StatusText(status);
+        return problem.Description();
     }
-}
-
-std::string shortText(FourCC id)
-{
-    std::string text = fourCCText(id);
-    text.erase(text.find_last_not_of(' ') + 1);
-    return text;
-}
-
-std::string sentenceOn(const ContainerProblem& problem)
-{
-    using Kind = ContainerProblem::Kind;
-    switch (problem.kind) {
-    case Kind::none:
-        break;
-    case Kind::status:
-        return StatusText(problem.status);
-    case Kind::empty:
-        return "is empty";
-    case Kind::noContainer:
-        return "no container known here (RIFF, RF64, BW64, AIFF, AIFC, REX2, CAF)";
-    case Kind::unknown:
-        return "no audio that can be decoded";
-    case Kind::headerCut:
-        return "ends within its header";
-    case Kind::noFormat:
-        return fmt::format("says nowhere what its samples are (no {} chunk)", shortText(problem.id));
-    case Kind::noSound:
-        return problem.id == 0 ? "no sound" : fmt::format("no sound (no {} chunk)", shortText(problem.id));
-    case Kind::noIndex:
-        return fmt::format("says nowhere where its samples are (no {} box)", shortText(problem.id));
-    case Kind::onlyRead:
-        return "containers of its kind are only read (RIFX, Wave64)";
-    case Kind::chunks:
-        return "its chunks cannot be read";
-    case Kind::reading:
-        return "cannot be read to compare it: " + systemErrorText(problem.systemError);
-    case Kind::adding: {
-        // The container's codes say which step failed; the system's last error often says why.
-        const bool isWriting = problem.status <= -3 && problem.status >= -5;
-        return addStatusText(problem.status) +
-               (isWriting && problem.systemError != 0 ? ": " + systemErrorText(problem.systemError) : "");
-    }
-    case Kind::notRemoved:
-        return fmt::format("the chunk \"{}\" cannot be removed: its body cannot be read", fourCCText(problem.id));
-    case Kind::notFound:
-        return "the chunk is not found as it should be after the edit";
-    case Kind::misplaced:
-        return "the chunk was not put behind all that is there";
-    case Kind::cutShort:
-        return "its last chunk is not whole";
-    case Kind::changed:
-        return fmt::format("the chunk \"{}\" is not as it was", fourCCText(problem.id));
-    case Kind::tailChanged:
-        return "what stands behind its chunks is not as it was";
-    }
-    return "";
 }
 
 std::string sentenceOn(const ContainerTail& tail)
@@ -201,9 +87,9 @@ void requireNone(const ContainerProblem& problem)
 {
     using Kind = ContainerProblem::Kind;
     if (problem.kind == Kind::empty || problem.kind == Kind::unknown)
-        throw OtherKind(sentenceOn(problem), OtherKind::Kind::unknown);
+        throw OtherKind(problem.Description(), OtherKind::Kind::unknown);
     if (problem)
-        throw Failure(sentenceOn(problem));
+        throw Failure(problem.Description());
 }
 
 ChunkSurvey surveyChunks(CAudioFileIO& file, FourCC id)
@@ -238,12 +124,12 @@ std::optional<std::string> objectionToRemoving(const ChunkSurvey& survey, FourCC
 void synchronize(int descriptor)
 {
     if (platform::systemCalls().fsync(descriptor) != 0)
-        throw Failure(systemErrorText(errno));
+        throw Failure(SystemErrorText(errno));
 }
 
 void synchronizeFolderOf(const std::string& path)
 {
     const std::filesystem::path folder = std::filesystem::path(path).parent_path();
     if (platform::systemCalls().syncFolder(folder.empty() ? "." : folder.c_str()) != 0)
-        throw Failure(systemErrorText(errno));
+        throw Failure(SystemErrorText(errno));
 }

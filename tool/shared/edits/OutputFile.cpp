@@ -17,7 +17,7 @@ namespace {
 
 [[noreturn]] void failToWrite(int error)
 {
-    throw Failure("the output cannot be written: " + systemErrorText(error));
+    throw Failure("the output cannot be written: " + SystemErrorText(error));
 }
 
 [[noreturn]] void failSinceItExists(const std::string& out)
@@ -41,7 +41,7 @@ void requireFolderOf(const std::string& out)
     const std::string folder = std::filesystem::path(out).parent_path().string();
     struct stat found = {};
     if (!folder.empty() && ::stat(folder.c_str(), &found) != 0)
-        throw Failure("the folder " + folder + ": " + systemErrorText(errno));
+        throw Failure("the folder " + folder + ": " + SystemErrorText(errno));
 }
 
 } // namespace
@@ -61,7 +61,7 @@ OutputFile::OutputFile(const std::string& out, const std::string& source, Existi
     if (exists && !S_ISREG(found.st_mode)) {
         device_ = platform::OwnedDescriptor(::open(out.c_str(), O_WRONLY | O_NOCTTY | O_CLOEXEC));
         if (!device_)
-            throw Failure(out + ": " + systemErrorText(errno));
+            throw Failure(out + ": " + SystemErrorText(errno));
         return;
     }
     if (exists && existing == Existing::refuse)
@@ -70,7 +70,7 @@ OutputFile::OutputFile(const std::string& out, const std::string& source, Existi
     if (exists)
         target_ = replaced_ = std::filesystem::canonical(out).string();
     if (exists && ::access(target_.c_str(), W_OK) != 0)
-        throw Failure(out + ": " + systemErrorText(errno));
+        throw Failure(out + ": " + SystemErrorText(errno));
     mode_ = 0666 & ~creationMask();
     removeTemporaryFilesAtEndingSignals();
     file_ = std::make_unique<CTemporaryFile>();
@@ -127,7 +127,7 @@ void OutputFile::finish()
     if (!file_)
         return;
     if (::fchmod(file_->Descriptor(), mode_) != 0)
-        throw Failure(systemErrorText(errno));
+        throw Failure(SystemErrorText(errno));
     requireNone(file_->Commit());
     if (const platform::OwnedDescriptor replaced = openReplaced())
         takePlaceOf(replaced);
@@ -137,7 +137,7 @@ void OutputFile::finish()
         publish();
     if (const FileProblem problem = file_->CommitFolder())
         throw Failure("the output is written, but its folder cannot be committed to storage: " +
-                      systemErrorText(problem.systemError));
+                      SystemErrorText(problem.systemError));
 }
 
 platform::OwnedDescriptor OutputFile::openReplaced() const

@@ -36,7 +36,7 @@ void addListed(std::vector<std::string>& names, int descriptor, char separator)
         if (got < 0 && errno == EINTR)
             continue;
         if (got < 0)
-            throw Failure(errno == EISDIR ? "is a folder, not a list of files" : systemErrorText(errno));
+            throw Failure(errno == EISDIR ? "is a folder, not a list of files" : SystemErrorText(errno));
         if (got == 0)
             break;
         std::string_view rest(piece.data(), static_cast<std::size_t>(got));
@@ -82,7 +82,7 @@ std::vector<std::string> allNames(const FileArguments& files)
     const platform::OwnedDescriptor opened(fromInput ? -1
                                                      : ::open(files.list.c_str(), O_RDONLY | O_NOCTTY | O_CLOEXEC));
     if (!fromInput && !opened)
-        throw Failure(systemErrorText(errno));
+        throw Failure(SystemErrorText(errno));
     addListed(names, fromInput ? STDIN_FILENO : opened.get(), files.isNulSeparated ? '\0' : '\n');
     if (names.size() == files.names.size())
         throw Failure("names no file");

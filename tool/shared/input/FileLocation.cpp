@@ -14,10 +14,10 @@ std::string absolutePath(const std::string& path)
     if (path.starts_with('/'))
         return path;
     if (path.empty())
-        throw Failure(systemErrorText(ENOENT));
+        throw Failure(SystemErrorText(ENOENT));
     char buffer[PATH_MAX]; // the system has no longer ones for it
     if (::getcwd(buffer, sizeof buffer) == nullptr)
-        throw Failure(systemErrorText(errno));
+        throw Failure(SystemErrorText(errno));
     std::string folder = buffer;
     if (!folder.ends_with('/'))
         folder += '/';

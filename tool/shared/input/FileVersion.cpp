@@ -19,6 +19,6 @@ FileVersion versionOf(const std::string& path)
 {
     struct stat status = {};
     if (::stat(systemPath(path).c_str(), &status) != 0)
-        throw Failure(systemErrorText(errno));
+        throw Failure(SystemErrorText(errno));
     return {status.st_dev, status.st_ino, status.st_size, nanoseconds(status.st_mtim), nanoseconds(status.st_ctim)};
 }

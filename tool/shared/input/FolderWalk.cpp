@@ -46,7 +46,7 @@ bool FolderWalk::run()
         if (root == kStandardInput)
             return visit_({root, {}});
         if (::stat(root.c_str(), &status) != 0)
-            return visit_({root, systemErrorText(errno)});
+            return visit_({root, SystemErrorText(errno)});
         if (!S_ISDIR(status.st_mode))
             return visit_({root, {}});
         rootLength_ = root.size();
@@ -88,7 +88,7 @@ bool FolderWalk::walk(const std::string& folder)
         return true;
     int error = 0;
     const std::vector<Entry> entries = entriesOf(folder, error);
-    if (error != 0 && !visit(folder, systemErrorText(error)))
+    if (error != 0 && !visit(folder, SystemErrorText(error)))
         return false;
     return std::all_of(entries.begin(), entries.end(),
                        [&](const Entry& entry) { return visitEntry(joined(folder, entry.name), entry); });

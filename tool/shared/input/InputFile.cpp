@@ -22,7 +22,7 @@ void requireRegularFile(const std::string& path)
 {
     struct stat status = {};
     if (::stat(systemPath(path).c_str(), &status) != 0)
-        throw Failure(systemErrorText(errno));
+        throw Failure(SystemErrorText(errno));
     if (S_ISDIR(status.st_mode))
         throw Failure("is a folder");
     if (!S_ISREG(status.st_mode))
@@ -37,7 +37,7 @@ std::string resolvedPath(const std::string& path)
     std::error_code error;
     const std::filesystem::path resolved = std::filesystem::canonical(path, error);
     if (error)
-        throw Failure(systemErrorText(error.value()));
+        throw Failure(SystemErrorText(error.value()));
     return resolved.string();
 }
 

@@ -51,7 +51,7 @@ std::string copyInput(int to)
         if (got < 0 && errno == EINTR)
             continue;
         if (got < 0)
-            return errno == EISDIR ? "is a folder" : systemErrorText(errno);
+            return errno == EISDIR ? "is a folder" : SystemErrorText(errno);
         if (got == 0)
             return {};
         size += got;
@@ -61,7 +61,7 @@ std::string copyInput(int to)
         for (std::string_view rest(piece->data(), static_cast<std::size_t>(got)); !rest.empty();) {
             const ssize_t written = ::write(to, rest.data(), rest.size());
             if (written < 0 && errno != EINTR)
-                return "standard input cannot be kept in memory: " + systemErrorText(errno);
+                return "standard input cannot be kept in memory: " + SystemErrorText(errno);
             rest.remove_prefix(static_cast<std::size_t>(std::max<ssize_t>(written, 0)));
         }
     }
@@ -73,7 +73,7 @@ Input takeInput()
         return {pathOf(STDIN_FILENO), {}, false};
     const int memory = ::memfd_create("standard input", MFD_CLOEXEC);
     if (memory < 0)
-        return {{}, "standard input cannot be kept in memory: " + systemErrorText(errno), true};
+        return {{}, "standard input cannot be kept in memory: " + SystemErrorText(errno), true};
     std::string problem = copyInput(memory);
     if (!problem.empty())
         ::close(memory);

@@ -18,7 +18,7 @@
 #include <set>
 #include <sys/stat.h>
 
-using Kind = TagField::Kind;
+using Kind = LoopTagField::Kind;
 using platform::Value;
 
 namespace {
@@ -77,7 +77,7 @@ std::optional<std::int64_t> integer(std::string_view text)
 }
 
 // The words that stand for a field's numbers: notes, any of the names for the same key ("F#" and "Gb"), modes, kinds.
-std::optional<std::int64_t> numberOfWord(const TagField& field, std::string_view text)
+std::optional<std::int64_t> numberOfWord(const LoopTagField& field, std::string_view text)
 {
     const std::string_view name = field.name;
     if (name == "midiRootNote")
@@ -99,13 +99,13 @@ std::optional<std::int64_t> numberOfWord(const TagField& field, std::string_view
     return std::nullopt;
 }
 
-std::optional<std::int64_t> numberOf(const TagField& field, std::string_view text)
+std::optional<std::int64_t> numberOf(const LoopTagField& field, std::string_view text)
 {
     const auto number = integer(text);
     return number ? number : numberOfWord(field, text);
 }
 
-std::string expectedOf(const TagField& field)
+std::string expectedOf(const LoopTagField& field)
 {
     const std::string_view name = field.name;
     const std::string words = name == "midiRootNote"   ? "a note such as C, F# or Bb, or "
@@ -115,7 +115,7 @@ std::string expectedOf(const TagField& field)
     return fmt::format("{}a whole number from {} to {}", words, field.least, field.most);
 }
 
-Value numberValue(const TagField& field, std::string_view key, std::string_view text)
+Value numberValue(const LoopTagField& field, std::string_view key, std::string_view text)
 {
     const auto number = numberOf(field, trimmed(text));
     if (!number || *number < field.least || *number > field.most)
@@ -141,7 +141,7 @@ Value transientsValue(std::string_view text)
     return transients;
 }
 
-Value fieldValue(const TagField& field, std::string_view key, std::string_view text)
+Value fieldValue(const LoopTagField& field, std::string_view key, std::string_view text)
 {
     if (trimmed(text).empty())
         return {};
@@ -162,14 +162,14 @@ Value fieldValue(const TagField& field, std::string_view key, std::string_view t
 
 bool isWord(std::string_view key, std::string_view word)
 {
-    const auto fields = fieldsForKey(word);
-    return !fields.empty() && fieldsForKey(key) == fields;
+    const auto fields = loopTagFieldsForKey(word);
+    return !fields.empty() && loopTagFieldsForKey(key) == fields;
 }
 
 std::string knownKeys()
 {
     std::string keys;
-    for (const TagField& field : tagFields())
+    for (const LoopTagField& field : loopTagFields())
         (keys += field.name) += ", ";
     return keys + "key, mode, signature; and beats, category, subCategory, kind";
 }
@@ -177,7 +177,7 @@ std::string knownKeys()
 std::string suggestion(std::string_view key)
 {
     std::vector<std::string_view> words{"key", "signature", "tempo"};
-    for (const TagField& field : tagFields())
+    for (const LoopTagField& field : loopTagFields())
         words.insert(words.end(), {field.name, field.word});
     return didYouMean(key, words);
 }
@@ -195,10 +195,10 @@ void refuseShown(std::string_view key, std::string_view text)
 }
 
 // The parts of a key by the fields that they are for: a note, with a mode behind it or without, or a mode alone.
-std::vector<TagAssignment> keyParts(std::string_view text, const std::vector<const TagField*>& fields)
+std::vector<LoopTagAssignment> keyParts(std::string_view text, const std::vector<const LoopTagField*>& fields)
 {
-    const TagField& root = *fields[0];
-    const TagField& mode = *fields[1];
+    const LoopTagField& root = *fields[0];
+    const LoopTagField& mode = *fields[1];
     if (const auto alone = numberOfWord(mode, text); alone && text != "m")
         return {{&mode, *alone}};
     for (std::size_t end = text.size(); end > 0; --end) { // the longest that is a note: "Bb" is no "B"
@@ -208,7 +208,7 @@ std::vector<TagAssignment> keyParts(std::string_view text, const std::vector<con
         if (!note || *note < root.least || *note > root.most || (!behind.empty() && !type) ||
             (type && (*type < mode.least || *type > mode.most)))
             continue;
-        std::vector<TagAssignment> parts{{&root, *note}};
+        std::vector<LoopTagAssignment> parts{{&root, *note}};
         if (type)
             parts.push_back({&mode, *type});
         return parts;
@@ -216,7 +216,7 @@ std::vector<TagAssignment> keyParts(std::string_view text, const std::vector<con
     refuseValue("key", text, "a note such as C, F# or Bb, with minor or major behind it or without,");
 }
 
-std::vector<TagAssignment> signatureParts(std::string_view text, const std::vector<const TagField*>& fields)
+std::vector<LoopTagAssignment> signatureParts(std::string_view text, const std::vector<const LoopTagField*>& fields)
 {
     const std::size_t slash = text.find('/');
     if (slash == std::string_view::npos || slash == 0 || slash + 1 == text.size() ||
@@ -226,36 +226,36 @@ std::vector<TagAssignment> signatureParts(std::string_view text, const std::vect
             {fields[1], numberValue(*fields[1], "signature", text.substr(slash + 1))}};
 }
 
-std::vector<TagAssignment> assignmentsOf(std::string_view key, std::string_view text)
+std::vector<LoopTagAssignment> assignmentsOf(std::string_view key, std::string_view text)
 {
-    const auto fields = fieldsForKey(key);
+    const auto fields = loopTagFieldsForKey(key);
     if (fields.empty())
         refuseShown(key, text);
     if (fields.empty())
         refuse(fmt::format("there is no tag \"{}\" (a file of that name is \"./{}={}\"){}; tags are {}", printable(key),
                            printable(key), printable(text), suggestion(key), knownKeys()));
-    std::vector<TagAssignment> parts;
+    std::vector<LoopTagAssignment> parts;
     if (!trimmed(text).empty() && isWord(key, "key")) {
         parts = keyParts(trimmed(text), fields);
     } else if (!trimmed(text).empty() && isWord(key, "signature")) {
         parts = signatureParts(trimmed(text), fields);
     } else {
-        for (const TagField* field : fields)
+        for (const LoopTagField* field : fields)
             parts.push_back({field, fieldValue(*field, key, text)});
     }
     return parts;
 }
 
-bool isUTF8(const Value& value)
+bool holdsUTF8(const Value& value)
 {
     const auto* text = value.get<std::string>();
     const auto* list = value.get<platform::Array>();
     return (text == nullptr || platform::String::fromUTF8(*text)) &&
-           (list == nullptr || std::ranges::all_of(*list, isUTF8));
+           (list == nullptr || std::ranges::all_of(*list, holdsUTF8));
 }
 
 // Notes by which a key may be called: "C" is one for 48, and 60 says more of which it is.
-bool isSameNote(const TagAssignment& a, const TagAssignment& b)
+bool isSameNote(const LoopTagAssignment& a, const LoopTagAssignment& b)
 {
     const auto* const first = a.value.get<std::int64_t>();
     const auto* const second = b.value.get<std::int64_t>();
@@ -264,12 +264,12 @@ bool isSameNote(const TagAssignment& a, const TagAssignment& b)
 }
 
 // JSON has a key in words and in numbers, which may both be given.
-void assign(std::vector<TagAssignment>& assignments, std::string_view key, std::string_view text)
+void assign(std::vector<LoopTagAssignment>& assignments, std::string_view key, std::string_view text)
 {
-    for (TagAssignment& part : assignmentsOf(key, text)) {
-        if (!isUTF8(part.value))
+    for (LoopTagAssignment& part : assignmentsOf(key, text)) {
+        if (!holdsUTF8(part.value))
             refuse(fmt::format("the value of {} is not valid UTF-8", key));
-        const auto earlier = std::ranges::find(assignments, part.field, &TagAssignment::field);
+        const auto earlier = std::ranges::find(assignments, part.field, &LoopTagAssignment::field);
         if (earlier == assignments.end())
             assignments.push_back(std::move(part));
         else if (isSameNote(*earlier, part))
@@ -301,7 +301,7 @@ TagArguments parseKeys(std::span<const std::string> arguments)
 {
     TagArguments parsed;
     for (const std::string& argument : arguments) {
-        const auto fields = fieldsForKey(argument);
+        const auto fields = loopTagFieldsForKey(argument);
         struct stat status = {};
         // A misspelt key must not pass for a missing file: without keys all tags of the other files would go.
         if (fields.empty() && argument.find('/') == std::string::npos &&
@@ -310,8 +310,8 @@ TagArguments parseKeys(std::span<const std::string> arguments)
                                suggestion(argument), knownKeys()));
         if (fields.empty())
             parsed.files.push_back(argument);
-        for (const TagField* field : fields)
-            if (std::ranges::find(parsed.assignments, field, &TagAssignment::field) == parsed.assignments.end())
+        for (const LoopTagField* field : fields)
+            if (std::ranges::find(parsed.assignments, field, &LoopTagAssignment::field) == parsed.assignments.end())
                 parsed.assignments.push_back({field, {}});
     }
     return parsed;

@@ -1,25 +1,17 @@
 // KEY=VALUE on the command line, as `tags` prints keys and values and as people type them.
 #pragma once
 
-#include "platform/core/Value.h"
-#include "tool/shared/looptags/LoopTagFields.h"
+#include "loops/tags/LoopTagsPatch.h"
 
 #include <span>
 #include <string>
 #include <vector>
 
-/// A field and its new value: null to clear it; of transients an array of frames, with each type other than 1 as an
-/// array of frame and type.
-struct TagAssignment {
-    const TagField* field;
-    platform::Value value;
-};
-
 /// Files and "KEY=VALUE" in any order, told apart: what has a "=" and no "/" ahead of it is an assignment. Throws
 /// UsageError for an unknown key, two values for one tag and a value that can never be.
 struct TagArguments {
     std::vector<std::string> files;
-    std::vector<TagAssignment> assignments;
+    std::vector<LoopTagAssignment> assignments;
 };
 TagArguments parseAssignments(std::span<const std::string> arguments);
 /// The same for "tags remove": what is a key and holds no "/" is one; its fields are to be cleared.

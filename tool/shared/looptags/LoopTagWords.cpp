@@ -1,9 +1,9 @@
-#include "tool/shared/looptags/LoopTags.h"
+#include "tool/shared/looptags/LoopTagWords.h"
 
 #include "loops/VireoLoopTerms.h"
+#include "loops/tags/LoopTagFields.h"
 #include "media/containers/ContainerHeaders.h"
 #include "tool/shared/arguments/QuotedText.h"
-#include "tool/shared/looptags/LoopTagFields.h"
 #include "tool/shared/output/JsonWriter.h"
 #include "tool/shared/output/Output.h"
 
@@ -11,6 +11,20 @@
 #include <cmath>
 
 namespace {
+
+// "C" to "B" for MIDI notes 48 to 59, the number for others.
+std::string noteName(std::int64_t note)
+{
+    const std::string_view name = VireoLoopNoteName(note);
+    return name.empty() ? std::to_string(note) : std::string(name);
+}
+
+// "minor", "major"; the number for what is neither.
+std::string modeName(std::int64_t keyType)
+{
+    const std::string_view name = VireoLoopModeName(keyType);
+    return name.empty() ? std::to_string(keyType) : std::string(name);
+}
 
 std::string keyText(const LoopTags& tags)
 {
@@ -34,13 +48,6 @@ std::string keyInWords(const LoopTags& tags)
                : fmt::format("{} (note {})", words, tags.number(VireoLoopCombinedTagsChunkDataMidiRootNoteKey));
 }
 
-std::string signatureText(const LoopTags& tags)
-{
-    const std::int64_t top = tags.number(VireoLoopCombinedTagsChunkDataSignatureTopKey);
-    const std::int64_t bottom = tags.number(VireoLoopCombinedTagsChunkDataSignatureBottomKey);
-    return top == 0 || bottom == 0 ? "" : fmt::format("{}/{}", top, bottom);
-}
-
 std::string numberText(std::int64_t number)
 {
     return number == 0 ? "" : std::to_string(number);
@@ -50,7 +57,7 @@ std::string numberText(std::int64_t number)
 template <const char* const& part>
 std::string aloneText(const LoopTags& tags)
 {
-    return signatureText(tags).empty() ? numberText(tags.number(part)) : "";
+    return loopSignature(tags).empty() ? numberText(tags.number(part)) : "";
 }
 
 std::string descriptorsText(const LoopTags& tags)
@@ -95,12 +102,6 @@ std::string transientsText(const LoopTags& tags)
     return text;
 }
 
-const char* kindOf(const SamplerTags::Loop& loop)
-{
-    constexpr const char* kinds[] = {"forward", "alternating", "backward", "other"};
-    return kinds[static_cast<std::size_t>(loop.kind)];
-}
-
 // "0-44099,50000-60000".
 std::string loopsText(const LoopTags& tags)
 {
@@ -119,7 +120,7 @@ std::string loopsInWords(const LoopTags& tags)
     const SamplerTags::Loop& loop = loops.front();
     return fmt::format("frames {} to {}{}{}", loop.firstFrame, loop.lastFrame,
                        loop.kind == SamplerTags::Loop::Kind::forward ? "" : ", ",
-                       loop.kind == SamplerTags::Loop::Kind::forward ? "" : kindOf(loop));
+                       loop.kind == SamplerTags::Loop::Kind::forward ? "" : loopKindName(loop.kind));
 }
 
 // Frames, each with its name.
@@ -150,7 +151,7 @@ const ShownTag kShownTags[] = {
     {"beatCount", "Beats",
      [](const LoopTags& tags) { return numberText(tags.number(VireoLoopCombinedTagsChunkDataBeatCountKey)); }},
     {"key", "Key", keyText, keyInWords},
-    {"signature", "Signature", signatureText},
+    {"signature", "Signature", loopSignature},
     {"signatureTop", "signatureTop", aloneText<VireoLoopCombinedTagsChunkDataSignatureTopKey>},
     {"signatureBottom", "signatureBottom", aloneText<VireoLoopCombinedTagsChunkDataSignatureBottomKey>},
     {"loopFileType", "Kind", kindText},
@@ -176,7 +177,7 @@ void writeSamplerLists(JsonWriter& json, const SamplerTags& sampler)
         json.key("loops").beginArray();
         for (const SamplerTags::Loop& loop : sampler.loops) {
             json.beginObject().member("firstFrame", loop.firstFrame).member("lastFrame", loop.lastFrame);
-            json.member("kind", kindOf(loop));
+            json.member("kind", loopKindName(loop.kind));
             if (loop.playCount > 0)
                 json.member("playCount", loop.playCount);
             json.member("source", fourCCText(loop.source)).endObject();
@@ -216,64 +217,10 @@ std::string sourceOf(const LoopTags& tags, std::string_view name)
 
 } // namespace
 
-std::map<std::string, std::string, std::less<>> sourcesOf(const LoopTags& tags)
-{
-    constexpr std::string_view inCategories[] = {"instrumentType", "instrumentSubType", "genre", "descriptors"};
-    constexpr std::pair<std::string_view, const char*> texts[] = {
-        {"title", "NAME"}, {"artist", "AUTH"}, {"copyright", "(c) "}, {"comments", "COMT"}};
-    const bool isAIFF = tags.fileType == kAIFF;
-    auto sources = tags.sources;
-    for (const TagValue& tag : tagValues(tags)) {
-        const auto* const text = std::ranges::find(texts, tag.name, [](const auto& each) { return each.first; });
-        const bool isInCategories = std::ranges::find(inCategories, tag.name) != std::end(inCategories);
-        sources.try_emplace(tag.name, text != std::end(texts)    ? isAIFF ? text->second : "info"
-                                      : isAIFF && isInCategories ? "cate"
-                                                                 : "basc");
-    }
-    if (!tags.transients.empty())
-        sources.emplace("transients", "trns");
-    return sources;
-}
-
-std::int64_t LoopTags::number(std::string_view key) const
-{
-    const auto* number = platform::find<std::int64_t>(combined, key);
-    return number != nullptr ? *number : 0;
-}
-
-std::string LoopTags::text(std::string_view key) const
-{
-    const auto* text = platform::find<std::string>(combined, key);
-    if (text == nullptr)
-        text = platform::find<std::string>(info, key);
-    return text != nullptr ? *text : std::string();
-}
-
-double LoopTags::tempo() const
-{
-    if (statedTempo > 0)
-        return statedTempo;
-    return VireoLoopTempo(number(VireoLoopCombinedTagsChunkDataBeatCountKey), frames, sampleRate);
-}
-
-std::string loopContainerName(FourCC fileType)
-{
-    switch (fileType) {
-    case kCaff:
-        return "CAF";
-    case fourCC("RIFX"): // big-endian
-        return "WAVE";
-    case fourCC("W64f"):
-        return "Wave64";
-    default:
-        return fourCCText(fileType);
-    }
-}
-
 std::string keyWords(const LoopTags& tags)
 {
     const std::int64_t note = tags.number(VireoLoopCombinedTagsChunkDataMidiRootNoteKey);
-    const std::string name = keyName(note), text = keyText(tags);
+    const std::string name = loopKeyName(note), text = keyText(tags);
     return name.empty() ? text : name + text.substr(noteName(note).size());
 }
 
@@ -292,67 +239,10 @@ TagText tagTextCalled(std::string_view name)
     return std::ranges::find_if(kShownTags, [&](const ShownTag& each) { return each.name == name; })->text;
 }
 
-platform::Value valueUnder(const platform::Dictionary& values, const char* key)
-{
-    const auto found = values.find(key);
-    return found == values.end() ? platform::Value() : found->second;
-}
-
-bool isAbsent(const platform::Value& value)
-{
-    if (const auto* number = value.get<std::int64_t>())
-        return *number == 0;
-    if (const auto* number = value.get<double>())
-        return *number == 0;
-    if (const auto* text = value.get<std::string>())
-        return text->empty();
-    const auto* list = value.get<platform::Array>();
-    return list == nullptr || std::all_of(list->begin(), list->end(), isAbsent);
-}
-
-std::vector<TagValue> tagValues(const LoopTags& tags)
-{
-    std::vector<TagValue> present;
-    for (const TagField& field : tagFields()) {
-        const platform::Dictionary& values = field.isFileInfo ? tags.info : tags.combined;
-        const auto found = field.key != nullptr ? values.find(field.key) : values.end();
-        if (found != values.end() && !isAbsent(found->second))
-            present.push_back({field.name, found->second});
-    }
-    if (const double tempo = tags.tempo(); tempo > 0)
-        present.push_back({"tempo", tempo});
-    return present;
-}
-
-std::vector<TagValue> tagRecord(const LoopTags& tags)
-{
-    std::vector<TagValue> record{{"fileType", fourCCText(tags.fileType)},
-                                 {"containerName", loopContainerName(tags.fileType)}};
-    if (tags.sampleRate > 0) {
-        record.push_back({"sampleRate", std::llround(tags.sampleRate)});
-        record.push_back({"frames", tags.frames});
-        record.push_back({"durationSeconds", static_cast<double>(tags.frames) / tags.sampleRate});
-    }
-    for (TagValue& tag : tagValues(tags)) {
-        const auto* const number = tag.value.get<std::int64_t>();
-        const std::string note = tag.name == "midiRootNote" && number ? keyName(*number) : "";
-        const std::string_view mode = tag.name == "keyType" && number ? VireoLoopModeName(*number) : "";
-        const bool endsSignature = tag.name == "signatureBottom" && !signatureText(tags).empty();
-        record.push_back(std::move(tag));
-        if (!note.empty())
-            record.push_back({"key", note});
-        if (!mode.empty())
-            record.push_back({"mode", std::string(mode)});
-        if (endsSignature)
-            record.push_back({"signature", signatureText(tags)});
-    }
-    return record;
-}
-
 void writeLoopTags(JsonWriter& json, const std::string& path, const LoopTags& tags)
 {
     json.beginObject().member("path", path);
-    for (const TagValue& tag : tagRecord(tags))
+    for (const LoopTagValue& tag : loopTagRecord(tags))
         json.member(tag.name, tag.value);
     if (!tags.chunks.empty()) {
         json.key("chunks").beginArray();
@@ -360,7 +250,7 @@ void writeLoopTags(JsonWriter& json, const std::string& path, const LoopTags& ta
             json.beginObject().member("id", chunk.id).member("size", chunk.size).endObject();
         json.endArray();
     }
-    if (const auto sources = sourcesOf(tags); !sources.empty()) {
+    if (const auto sources = loopTagSources(tags); !sources.empty()) {
         json.key("sources").beginObject();
         for (const auto& [name, chunk] : sources)
             json.member(name, chunk);

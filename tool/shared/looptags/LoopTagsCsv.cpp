@@ -20,10 +20,10 @@ std::string loopRow(const std::string& path, const LoopTags& tags)
 {
     Record record;
     record.member("path", path);
-    for (const TagValue& tag : tagRecord(tags))
+    for (const LoopTagValue& tag : loopTagRecord(tags))
         record.member(tag.name, tag.value);
     platform::Array sources, loops, ids;
-    for (const auto& [name, chunk] : sourcesOf(tags))
+    for (const auto& [name, chunk] : loopTagSources(tags))
         sources.emplace_back(fmt::format("{}={}", name, chunk));
     for (const auto& loop : tags.sampler.loops)
         loops.emplace_back(fmt::format("{}-{}", loop.firstFrame, loop.lastFrame));

@@ -1,7 +1,7 @@
 // The loop tags of files as rows of CSV.
 #pragma once
 
-#include "tool/shared/looptags/LoopTags.h"
+#include "loops/tags/LoopTags.h"
 #include "tool/shared/output/CsvRecords.h"
 
 CsvColumns loopColumns();

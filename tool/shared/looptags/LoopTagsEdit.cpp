@@ -1,7 +1,10 @@
 #include "tool/shared/looptags/LoopTagsEdit.h"
 
+#include "loops/tags/LoopTagsError.h"
 #include "tool/shared/access/FileAccess.h"
-#include "tool/shared/looptags/LoopTagFields.h"
+#include "tool/shared/arguments/UsageError.h"
+#include "tool/shared/input/FileLocation.h"
+#include "tool/shared/looptags/LoopTagFiles.h"
 #include "tool/shared/output/Failure.h"
 #include "tool/shared/output/JsonRecords.h"
 #include "tool/shared/output/ShownName.h"
@@ -12,40 +15,6 @@
 using platform::Value;
 
 namespace {
-
-const Value* find(const std::vector<TagValue>& tags, const std::string& name)
-{
-    const auto found = std::ranges::find(tags, name, &TagValue::name);
-    return found != tags.end() ? &found->value : nullptr;
-}
-
-// Every member once, in the order of `after`, then what only `before` has.
-void addDifferences(const std::vector<TagValue>& before, const std::vector<TagValue>& after,
-                    std::vector<TagChange>& changes)
-{
-    for (const auto& [name, to] : after) {
-        const Value* const known = find(before, name);
-        const Value from = known != nullptr ? *known : Value();
-        if (from != to && !(isAbsent(from) && isAbsent(to)))
-            changes.push_back({name, isAbsent(from) ? Value() : from, isAbsent(to) ? Value() : to});
-    }
-    for (const auto& [name, from] : before)
-        if (find(after, name) == nullptr && !isAbsent(from))
-            changes.push_back({name, from, {}});
-}
-
-Value countOf(const std::vector<VireoLoopTransient>& transients)
-{
-    return transients.empty() ? Value() : Value(transients.size());
-}
-
-std::vector<TagValue> chunkSizes(const LoopTags& tags)
-{
-    std::vector<TagValue> sizes;
-    for (const LoopTags::Chunk& chunk : tags.chunks)
-        sizes.push_back({chunk.id, fmt::format("{} bytes", chunk.size)});
-    return sizes;
-}
 
 std::string inWords(const Value& value)
 {
@@ -62,10 +31,10 @@ std::string inWords(const Value& value)
     return joined;
 }
 
-std::string inWords(const std::vector<TagChange>& changes)
+std::string inWords(const std::vector<LoopTagChange>& changes)
 {
     std::string text;
-    for (const TagChange& change : changes) {
+    for (const LoopTagChange& change : changes) {
         text += (text.empty() ? "" : ", ") + change.key;
         if (!change.to.isNull())
             text += "=" + inWords(change.to);
@@ -85,7 +54,7 @@ public:
     {
     }
 
-    void add(const std::string& path, const TagsPlan& plan, const std::string& backup)
+    void add(const std::string& path, const LoopTagsPlan& plan, const std::string& backup)
     {
         if (output_.wantsJson())
             addJson(path, plan, backup);
@@ -107,7 +76,7 @@ public:
     }
 
 private:
-    std::string sentence(const std::string& path, const TagsPlan& plan, const std::string& backup) const
+    std::string sentence(const std::string& path, const LoopTagsPlan& plan, const std::string& backup) const
     {
         std::string text = path + ": ";
         if (plan.changes.empty())
@@ -119,12 +88,12 @@ private:
         return text + (backup.empty() ? "" : "; backup " + backup);
     }
 
-    void addJson(const std::string& path, const TagsPlan& plan, const std::string& backup)
+    void addJson(const std::string& path, const LoopTagsPlan& plan, const std::string& backup)
     {
         JsonWriter& json = json_.begin();
         json.beginObject().member("path", path).member("action", editor_.action);
         json.key("changes").beginArray();
-        for (const TagChange& change : plan.changes)
+        for (const LoopTagChange& change : plan.changes)
             json.beginObject()
                 .member("key", change.key)
                 .knownMember("from", change.from)
@@ -145,10 +114,26 @@ private:
     JsonRecords json_;
 };
 
+// A tag that was asked for and cannot be kept is a mistake on the command line; one that would be lost on the way makes
+// the edit fail.
+LoopTagsPlan planned(const TagsEditor& editor, const std::string& path)
+{
+    platform::Error error;
+    auto plan = editor.plan(ownLoopTagsOf(path), fileLocation(path), &error);
+    if (plan)
+        return std::move(*plan);
+    const bool isOurs = error.domain == kLoopTagsErrorDomain;
+    if (isOurs && error.code == static_cast<std::int64_t>(LoopTagsError::cannotKeep))
+        throw UsageError(printable(path) + ": " + printable(error.description));
+    if (isOurs && error.code == static_cast<std::int64_t>(LoopTagsError::wouldLose))
+        throw Failure(printable(error.description));
+    failForTags(path, error);
+}
+
 void editFile(const std::string& path, const TagsEditor& editor, const EditOptions& options, EditReport& report)
 {
     SafeEdit edit(path, options);
-    const TagsPlan plan = editor.plan(readOwnLoopTags(edit.target()), edit.target());
+    const LoopTagsPlan plan = planned(editor, edit.target());
     std::string backup;
     if (!options.dryRun && !plan.changes.empty())
         backup = edit.apply(EditScope::ofLoopTags(), [&](const std::string& copy) { writeTags(copy, plan); });
@@ -156,34 +141,6 @@ void editFile(const std::string& path, const TagsEditor& editor, const EditOptio
 }
 
 } // namespace
-
-std::vector<TagChange> differences(const LoopTags& before, const LoopTags& after)
-{
-    std::vector<TagChange> changes;
-    addDifferences(tagValues(before), tagValues(after), changes);
-    if (before.transients != after.transients)
-        changes.push_back({"transients", countOf(before.transients), countOf(after.transients)});
-    addDifferences(chunkSizes(before), chunkSizes(after), changes);
-    return changes;
-}
-
-void writeTags(const std::string& path, const TagsPlan& plan)
-{
-    bool written = false;
-    {
-        VireoLoopChunksManager manager =
-            openLoopFile(path, platform::AudioFile::Permission::readWrite, LoopFiles::waveToo);
-        errno = 0;
-        written = plan.write(manager);
-    }
-    if (!written)
-        throw Failure(errno != 0 ? systemErrorText(errno) : "its tags cannot be written");
-    VireoLoopChunksManager manager = openLoopFile(path, platform::AudioFile::Permission::read, LoopFiles::waveToo);
-    if (readRawLoopTags(manager) != plan.bytes)
-        throw Failure("the tags are not found as they should be after the edit");
-    if (const auto wrong = differences(readOwnLoopTags(path), plan.after); !wrong.empty())
-        throw Failure("the tags are not found as they should be after the edit: " + wrong.front().key);
-}
 
 bool editTags(const FileArguments& named, const TagsEditor& editor, EditOptions edit, const OutputOptions& output)
 {
@@ -194,7 +151,7 @@ bool editTags(const FileArguments& named, const TagsEditor& editor, EditOptions 
     for (const std::string& path : files)
         try {
             const FileAccess access = accessForReading(path, edit.waiting());
-            editor.plan(readOwnLoopTags(path), path);
+            planned(editor, path);
         } catch (const Failure&) { // reported when its turn comes
         }
     EditReport report(editor, edit, output);

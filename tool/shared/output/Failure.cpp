@@ -7,15 +7,7 @@
 
 #include <fmt/core.h>
 
-#include <cerrno>
 #include <cstdio>
-#include <cstring>
-
-std::string systemErrorText(int error)
-{
-    const std::int32_t status = PosixErrorToOSErr(error);
-    return (status == kStatusIOError && error != EIO) || error == ELOOP ? std::strerror(error) : StatusText(status);
-}
 
 void requireOK(std::int32_t status)
 {

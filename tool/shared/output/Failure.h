@@ -1,6 +1,8 @@
 // Failures of the command: each becomes one line on standard error, `ktfiles: FILE: what is wrong`.
 #pragma once
 
+#include "platform/core/SystemErrorText.h"
+
 #include <cstdint>
 #include <stdexcept>
 #include <string>
@@ -29,9 +31,6 @@ class ToldFailure : public Failure {
 public:
     using Failure::Failure;
 };
-
-/// A short text for a system error number, in the vocabulary of the library's status codes where they have one.
-std::string systemErrorText(int error);
 
 /// Throws the Failure of a status that is not 0.
 void requireOK(std::int32_t status);

@@ -64,6 +64,6 @@ bool Output::finish()
 {
     flush();
     if (failed() && error_ != EPIPE)
-        reportFailure("standard output", systemErrorText(error_));
+        reportFailure("standard output", SystemErrorText(error_));
     return !failed();
 }

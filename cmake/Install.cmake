@@ -20,8 +20,8 @@ if(TARGET ktfiles_loudness)
 endif()
 
 # The headers of implementations (platform/posix/ and the like) are nobody's business.
-foreach(room platform/core platform files loops/tagging audiofile audiofile/metadata files/registry loops loops/overview loops/tags adm coordination
-        project)
+foreach(room platform/core platform files loops/tagging audiofile audiofile/fields audiofile/metadata files/registry loops loops/overview
+        loops/tags adm coordination project)
     file(GLOB headers CONFIGURE_DEPENDS ${PROJECT_SOURCE_DIR}/src/${room}/*.h)
     install(FILES ${headers} DESTINATION ${CMAKE_INSTALL_INCLUDEDIR}/KTFiles/${room} COMPONENT development)
 endforeach()

@@ -26,6 +26,7 @@ ARROWS = {
     "loops/tagging": {"platform/core"},
     "audiofile/metadata": {"loops/tagging", "platform/core"},
     "audiofile": {"files", "loops/tagging", "media/decoding", "platform"},
+    "audiofile/fields": {"audiofile", "audiofile/metadata", "media/tags"},
     "loops": {"audiofile", "audiofile/metadata", "files", "loops/tagging", "media/decoding", "platform"},
     "loops/overview": {"audiofile", "files", "media/samples", "platform"},
     "loops/tags": {"loops"},

@@ -1,5 +1,6 @@
 // ktfiles info: what audio files are.
 #include "audiofile/AudioDigest.h"
+#include "platform/core/HexText.h"
 #include "tool/info/FileDescription.h"
 #include "tool/info/InfoCheck.h"
 #include "tool/shared/access/FileAccess.h"
@@ -12,7 +13,6 @@
 #include "tool/shared/output/ClockTime.h"
 #include "tool/shared/output/DataRecords.h"
 #include "tool/shared/output/Failure.h"
-#include "tool/shared/output/HexText.h"
 #include "tool/shared/output/Progress.h"
 #include "tool/shared/output/Table.h"
 

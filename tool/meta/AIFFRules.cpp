@@ -12,7 +12,7 @@
 
 namespace {
 
-constexpr FourCC kAnnotation = fourCC("ANNO"), kComments = fourCC("COMT"), kMarkers = fourCC("MARK"),
+constexpr FourCC kAnnotation = fourCC("ANNO"), kCommentList = fourCC("COMT"), kMarkers = fourCC("MARK"),
                  kInstrument = fourCC("INST");
 constexpr std::int16_t kMostId = std::numeric_limits<std::int16_t>::max();
 
@@ -60,7 +60,7 @@ void putOrRemove(MetaEdit& edit, FourCC id, const List& list, bool isEmpty)
 
 CommentList commentsOf(MetaEdit& edit)
 {
-    return valueOf<CommentList>(edit, kComments);
+    return valueOf<CommentList>(edit, kCommentList);
 }
 
 template <class Change>
@@ -72,13 +72,13 @@ void changeComment(MetaEdit& edit, const MetaStep& step, Change change)
         return;
     if (*index == list.comments.size()) {
         if (list.missingComments != 0)
-            MetaEdit::refuseDamaged(kComments);
+            MetaEdit::refuseDamaged(kCommentList);
         list.lastIsPadded = true;
         list.comments.emplace_back().timeStamp =
             static_cast<std::uint32_t>(std::time(nullptr)) + AIFFComment::kSecondsTo1970;
     }
     change(list, *index);
-    putChunk(edit, kComments, list);
+    putChunk(edit, kCommentList, list);
 }
 
 void setCommentText(MetaEdit& edit, const MetaStep& step)
@@ -116,10 +116,10 @@ void removeComment(MetaEdit& edit, const MetaStep& step)
     if (!index)
         return;
     if (list.missingComments != 0)
-        MetaEdit::refuseDamaged(kComments);
+        MetaEdit::refuseDamaged(kCommentList);
     list.comments.erase(list.comments.begin() + static_cast<std::ptrdiff_t>(*index));
     edit.itemRemoved(step, 0);
-    putOrRemove(edit, kComments, list, list.comments.empty() && list.behind.empty());
+    putOrRemove(edit, kCommentList, list, list.comments.empty() && list.behind.empty());
 }
 
 // "mark":
@@ -165,12 +165,12 @@ void setMarkerPosition(MetaEdit& edit, const MetaStep& step)
 /// Comments and the loops of "INST" that name a marker `from` name `to`; 0: none, and a loop is none then.
 void renameMarker(MetaEdit& edit, std::int16_t from, std::int16_t to)
 {
-    if (edit.find(kComments) != nullptr) {
+    if (edit.find(kCommentList) != nullptr) {
         CommentList list = commentsOf(edit);
         for (std::size_t i = 0; i < list.comments.size(); ++i)
             if (list.comments[i].marker == from && !edit.names(fmt::format("comt[{}].marker", i)))
                 list.comments[i].marker = to;
-        putChunk(edit, kComments, list);
+        putChunk(edit, kCommentList, list);
     }
     MetaChunk* const chunk = edit.find(kInstrument);
     auto instrument = chunk != nullptr ? AIFFInstrumentChunk::read(chunk->body) : std::nullopt;
@@ -239,7 +239,7 @@ constexpr MetaRule kAIFFRules[] = {
     {"comt[N].timeStamp", K::moment, {}, setCommentTime},
     {"comt[N].marker", K::integer, {0, 32767}, setCommentMarker},
     {"comt[N]", K::none, {}, removeComment},
-    {"comt", K::none, {}, removeChunk<kComments>},
+    {"comt", K::none, {}, removeChunk<kCommentList>},
 
     {"mark[N].position", K::time, {}, setMarkerPosition, true},
     {"mark[N].name", K::text, {0, 255}, setMarkerName},

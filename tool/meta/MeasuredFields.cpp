@@ -2,12 +2,12 @@
 
 #include "audiofile/AudioDigest.h"
 #include "media/loudness/LoudnessMeter.h"
+#include "platform/core/HexText.h"
 #include "platform/core/Status.h"
 #include "tool/shared/arguments/UsageError.h"
 #include "tool/shared/input/InputFile.h"
 #include "tool/shared/input/SoundReader.h"
 #include "tool/shared/output/Failure.h"
-#include "tool/shared/output/HexText.h"
 #include "tool/shared/output/Progress.h"
 
 #include <fmt/format.h>

@@ -26,7 +26,7 @@ bool isHistory(const MetaName& name)
     return name.group() == "bext" && name.parts.size() == 2 && name.parts[1].name == kHistory;
 }
 
-std::string textOf(const MetaField& field)
+std::string cellTextOf(const MetaField& field)
 {
     return std::visit([](const auto& value) { return fmt::format("{}", value); }, field.value);
 }
@@ -42,9 +42,9 @@ void eraseNamesOfMarkers(std::vector<MetaCell>& cells, const std::vector<MetaFie
     std::set<std::string> markers, names;
     for (const MetaField& field : fields)
         if (field.group == "mark" && field.name.ends_with("].id"))
-            markers.insert(textOf(field));
+            markers.insert(cellTextOf(field));
     for (const MetaField& field : fields)
-        if (field.group == "strg" && field.name.ends_with("].id") && markers.contains(textOf(field)))
+        if (field.group == "strg" && field.name.ends_with("].id") && markers.contains(cellTextOf(field)))
             names.insert(field.fullName().substr(0, field.fullName().find('.')) + ".text");
     std::erase_if(cells, [&](const MetaCell& cell) { return names.contains(cell.name.text); });
 }
@@ -231,7 +231,7 @@ private:
         for (const auto& [name, cell] : there_)
             for (std::size_t part = 0; part + 1 < cell.name.parts.size(); ++part)
                 items.insert(cell.name.upTo(part)); // a chunk ahead of its items
-        const std::vector<MetaField> fields = fieldsOf(held_);
+        const std::vector<MetaField> fields = MetadataFieldsOf(held_);
         for (const std::string& item : items) {
             const MetaRule* const rule = ruleFor(parsedName(item), held_.container);
             const bool goes =
@@ -271,21 +271,21 @@ private:
 std::vector<MetaCell> cellsOf(const HeldMetadata& held, const MetaGroups& groups)
 {
     std::vector<MetaCell> cells;
-    const std::vector<MetaField> fields = fieldsOf(held, groups);
+    const std::vector<MetaField> fields = MetadataFieldsOf(held, groups);
     for (const MetaField& field : fields) {
         auto name = metaNameFromText(field.fullName());
         const MetaRule* const rule = name && !field.byteSize ? ruleFor(*name, held.container) : nullptr;
         if (rule == nullptr || rule->kind == MetaKind::none)
             continue;
         if (!isHistory(*name)) {
-            cells.push_back({std::move(*name), textOf(field)});
+            cells.push_back({std::move(*name), cellTextOf(field)});
             continue;
         }
         const std::string whole = name->upTo(0) + "." + std::string(kHistory);
         if (!cells.empty() && cells.back().name.text == whole)
-            cells.back().text += "\n" + textOf(field);
+            cells.back().text += "\n" + cellTextOf(field);
         else
-            cells.push_back({parsedName(whole), textOf(field)});
+            cells.push_back({parsedName(whole), cellTextOf(field)});
     }
     if (held.container == fourCC("caff"))
         eraseNamesOfMarkers(cells, fields);

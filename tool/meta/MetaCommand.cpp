@@ -1,6 +1,7 @@
 #include "tool/meta/MetaCommand.h"
 
-#include "tool/meta/FileMetadata.h"
+#include "audiofile/fields/FileMetadata.h"
+#include "tool/meta/MetaFile.h"
 #include "tool/meta/MetaText.h"
 #include "tool/shared/access/FileAccess.h"
 #include "tool/shared/arguments/CommandLine.h"
@@ -61,7 +62,7 @@ std::string lowered(std::string text)
 
 MetaGroups metaGroupsFromText(const std::string& text)
 {
-    const std::vector<std::string> known = metaGroups();
+    const std::vector<std::string> known = MetadataGroupNames();
     MetaGroups groups;
     for (std::size_t begin = 0; begin <= text.size();) {
         const std::size_t end = std::min(text.find(',', begin), text.size());

@@ -1,7 +1,7 @@
 // What the verbs below `ktfiles meta` share.
 #pragma once
 
-#include "tool/meta/FileMetadata.h"
+#include "audiofile/fields/FileMetadata.h"
 
 class CommandLine;
 class Verb;

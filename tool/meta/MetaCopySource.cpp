@@ -1,6 +1,7 @@
 #include "tool/meta/MetaCopySource.h"
 
 #include "media/containers/ContainerHeaders.h"
+#include "tool/meta/MetaFile.h"
 #include "tool/shared/input/InputFile.h"
 #include "tool/shared/output/Failure.h"
 #include "tool/shared/portable/PortableMarkers.h"
@@ -134,7 +135,9 @@ MetaCopySource::Content MetaCopySource::translated(Family target, bool isLinearP
             markers.addFromCAF(chunk.body, names);
     HeldMetadata made;
     made.container = target == Family::wave ? fourCC("RIFF") : target == Family::aiff ? kFORM : kCaff;
-    made.readers = target == Family::wave ? waveReaders() : target == Family::aiff ? aiffReaders() : cafReaders();
+    made.kind = target == Family::wave   ? platform::ContainerKind::riff
+                : target == Family::aiff ? platform::ContainerKind::iff
+                                         : platform::ContainerKind::caf;
     made.source.order = target == Family::wave ? std::endian::little : std::endian::big;
     made.sampleRate = held_.sampleRate;
     const FourCC type = target == Family::wave ? kWAVE : target == Family::aiff ? kAIFF : kCaff;

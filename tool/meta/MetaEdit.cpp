@@ -331,7 +331,7 @@ std::string whyNotEdited(const std::string& name)
     const std::string group = parsed ? parsed->group() : name;
     const auto isSame = [&](std::string_view other) { return equalIgnoringASCIICase(other, group); };
     const auto isOf = [&](std::string_view pattern) { return isSame(pattern.substr(0, pattern.find_first_of("[."))); };
-    if (std::ranges::none_of(known, isOf) && std::ranges::any_of(metaGroups(), isSame))
+    if (std::ranges::none_of(known, isOf) && std::ranges::any_of(MetadataGroupNames(), isSame))
         return ": " + group + " is only read";
     return "; they are those that meta prints of bext, info, ixml, cue, smpl, acid, cart, NAME, AUTH, (c), ANNO, comt, "
            "mark and strg";

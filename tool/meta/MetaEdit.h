@@ -2,7 +2,7 @@
 // into its chunk, of which all else stays to the byte.
 #pragma once
 
-#include "tool/meta/FileMetadata.h"
+#include "audiofile/fields/FileMetadata.h"
 #include "tool/meta/MetaNames.h"
 #include "tool/meta/MetaValues.h"
 

@@ -4,6 +4,7 @@
 #include "media/containers/ContainerHeaders.h"
 #include "media/userdata/AudioFileService.h"
 #include "platform/core/Status.h"
+#include "tool/meta/MetaFile.h"
 #include "tool/shared/edits/EditProblems.h"
 #include "tool/shared/input/FileLocation.h"
 #include "tool/shared/input/InputFile.h"
@@ -73,7 +74,8 @@ std::vector<MetaChange> changesOf(const MetaPlan& plan, const std::vector<std::s
     for (const std::string& item : removedItems)
         shifted.insert(item.substr(0, item.find_first_of(".[")));
     std::map<std::string, const MetaField*, std::less<>> before, after;
-    const std::vector<MetaField> fieldsBefore = fieldsOf(plan.before), fieldsAfter = fieldsOf(plan.after);
+    const std::vector<MetaField> fieldsBefore = MetadataFieldsOf(plan.before),
+                                 fieldsAfter = MetadataFieldsOf(plan.after);
     for (const MetaField& field : fieldsBefore)
         before.emplace(field.fullName(), &field);
     for (const MetaField& field : fieldsAfter)

@@ -1,7 +1,7 @@
 // What is written of a file's metadata, in each form of output.
 #pragma once
 
-#include "tool/meta/FileMetadata.h"
+#include "audiofile/fields/FileMetadata.h"
 #include "tool/shared/output/CsvRecords.h"
 
 /// Of each file on its own, so that those who read the files make the texts too.

@@ -6,7 +6,7 @@
 
 namespace {
 
-constexpr double kFramesPerPoint = static_cast<double>(kOverviewFramesPerPoint);
+constexpr double kFramesOfPoint = static_cast<double>(kOverviewFramesPerPoint);
 
 // Lowest, highest and sums of points. Long runs go through lanes of a fixed number, which the compiler makes vectors
 // of: twelve hours are eight million points.
@@ -69,10 +69,10 @@ private:
 std::vector<WaveformColumn> foldedColumns(const Waveform& waveform, double from, double to, int columns)
 {
     const auto count = static_cast<std::int64_t>(waveform.points.size());
-    const double pointsPerColumn = (to - from) / kFramesPerPoint / columns;
+    const double pointsPerColumn = (to - from) / kFramesOfPoint / columns;
     std::vector<WaveformColumn> result(static_cast<std::size_t>(columns));
     for (int i = 0; i < columns; ++i) {
-        const double start = from / kFramesPerPoint + pointsPerColumn * i;
+        const double start = from / kFramesOfPoint + pointsPerColumn * i;
         // A column that ends where a point begins has nothing of it, whatever rounding says.
         constexpr double kSlack = 1e-6;
         const std::int64_t first =

@@ -19,14 +19,14 @@ const char* stateOf(const Pair& pair)
     return pair.hasLeft && pair.hasRight ? "pair" : pair.hasLeft ? "right missing" : "left missing";
 }
 
-constexpr const char* kColumns[] = {"left", "right", "leftExists", "rightExists", "path", "error"};
+constexpr const char* kPairColumns[] = {"left", "right", "leftExists", "rightExists", "path", "error"};
 
 class PairWriter {
 public:
     explicit PairWriter(const OutputOptions& options)
         : form_(outputForm(options)),
           color_(usesColor(options.color)),
-          records_(options, kColumns)
+          records_(options, kPairColumns)
     {
     }
 

@@ -1,9 +1,10 @@
-#include "tool/meta/FileMetadata.h"
+#include "audiofile/fields/FileMetadata.h"
 
+#include "audiofile/CAudioFileIO.h"
+#include "audiofile/fields/readers/MetaReaders.h"
+#include "audiofile/fields/readers/TagReader.h"
 #include "platform/core/ASCIICase.h"
-#include "tool/meta/TagReader.h"
-#include "tool/shared/input/InputFile.h"
-#include "tool/shared/output/Failure.h"
+#include "platform/core/Status.h"
 
 #include <algorithm>
 #include <array>
@@ -21,9 +22,9 @@ constexpr std::array kStructure{fourCC("fmt "), fourCC("data"), fourCC("ds64"), 
                                 fourCC("FVER"), fourCC("desc"), fourCC("pakt"), fourCC("kuki"), fourCC("JUNK"),
                                 fourCC("junk"), fourCC("PAD "), fourCC("FLLR"), fourCC("free")};
 
-std::span<const MetaReader> readersOf(const ContainerExtent& extent)
+std::span<const MetaReader> readersOf(platform::ContainerKind kind)
 {
-    switch (extent.kind) {
+    switch (kind) {
     case platform::ContainerKind::iff:
         return aiffReaders();
     case platform::ContainerKind::caf:
@@ -88,17 +89,27 @@ std::int64_t mostOf(const MetaReader& reader)
     return isText ? kMostOfText : kMostOfList;
 }
 
-/// The chunks that may be metadata, in the order of the file; with `extent` of the container.
-MetaSource collect(CAudioFileIO& file, const MetaGroups& groups, ContainerExtent& extent)
+bool failWith(platform::Error* error, MetadataError code, std::string description)
 {
-    MetaSource source;
+    return platform::fail(error, kMetadataErrorDomain, static_cast<std::int64_t>(code), std::move(description));
+}
+
+bool succeeded(std::int32_t status, platform::Error* error)
+{
+    return status == kStatusOK || platform::fail(error, platform::ErrorDomain::status, status, StatusText(status));
+}
+
+/// The chunks that may be metadata, in the order of the file; with `extent` of the container.
+bool collect(CAudioFileIO& file, const MetaGroups& groups, ContainerExtent& extent, MetaSource& source,
+             platform::Error* error)
+{
     std::int32_t readStatus = kStatusOK;
     std::int64_t room = kMostBytes;
     const std::int32_t status = file.ForEachChunk(
         [&](const ChunkEntry& entry) {
             if (std::ranges::find(kStructure, entry.id) != kStructure.end())
                 return true;
-            const std::span<const MetaReader> readers = readersOf(extent);
+            const std::span<const MetaReader> readers = readersOf(extent.kind);
             const MetaReader* const reader = readerOf(entry.id, readers);
             if (!isWanted(entry.id, reader, groups) && !isReferredTo(entry.id, readers, groups))
                 return true;
@@ -115,13 +126,16 @@ MetaSource collect(CAudioFileIO& file, const MetaGroups& groups, ContainerExtent
             return readStatus == kStatusOK;
         },
         &extent);
-    requireOK(readStatus);
+    if (!succeeded(readStatus, error))
+        return false;
     if (status != kStatusOK)
-        throw Failure(source.chunks.empty() ? "its container header cannot be read" : "a chunk header cannot be read");
+        return failWith(error, MetadataError::badHeader,
+                        source.chunks.empty() ? "its container header cannot be read"
+                                              : "a chunk header cannot be read");
     source.order = extent.kind == platform::ContainerKind::riff || extent.kind == platform::ContainerKind::wave64
                        ? std::endian::little
                        : std::endian::big;
-    return source;
+    return true;
 }
 
 void readChunk(const MetaChunk& chunk, std::span<const MetaReader> readers, const MetaSource& source,
@@ -138,15 +152,16 @@ void readChunk(const MetaChunk& chunk, std::span<const MetaReader> readers, cons
         fields.preview("", chunk.body, static_cast<std::uint64_t>(chunk.size));
 }
 
-HeldMetadata holdChunks(CAudioFileIO& file, const MetaGroups& groups)
+std::optional<HeldMetadata> holdChunks(CAudioFileIO& file, const MetaGroups& groups, platform::Error* error)
 {
     ContainerExtent extent;
-    HeldMetadata held;
-    held.source = collect(file, groups, extent);
-    held.container = extent.id;
-    held.readers = readersOf(extent);
-    held.sampleRate = file.Info().exactSampleRate;
-    held.frames = file.InfoStatus() == kStatusOK ? file.Info().frames : -1;
+    std::optional<HeldMetadata> held(std::in_place);
+    if (!collect(file, groups, extent, held->source, error))
+        return std::nullopt;
+    held->container = extent.id;
+    held->kind = extent.kind;
+    held->sampleRate = file.Info().exactSampleRate;
+    held->frames = file.InfoStatus() == kStatusOK ? file.Info().frames : -1;
     return held;
 }
 
@@ -162,42 +177,46 @@ void readAhead(CAudioFileIO& file)
 
 } // namespace
 
-HeldMetadata holdMetadata(const std::string& path, const MetaGroups& groups)
+std::optional<HeldMetadata> HoldMetadata(const CFileRef& ref, const MetaGroups& groups, platform::Error* error)
 {
     CAudioFileIO file;
     readAhead(file);
-    openChunks(file, path);
-    return holdChunks(file, groups);
+    if (!succeeded(file.OpenForChunks(ref, 0), error))
+        return std::nullopt;
+    if (file.HasChunks())
+        return holdChunks(file, groups, error);
+    failWith(error, MetadataError::noChunks, "holds no chunks");
+    return std::nullopt;
 }
 
-std::vector<MetaField> fieldsOf(const HeldMetadata& held, const MetaGroups& groups)
+std::vector<MetaField> MetadataFieldsOf(const HeldMetadata& held, const MetaGroups& groups)
 {
     using platform::FallbackEncoding;
     MetaFields fields(held.sampleRate,
                       held.container == kFORM ? FallbackEncoding::macintosh : FallbackEncoding::latin1);
+    const std::span<const MetaReader> readers = readersOf(held.kind);
     for (const MetaChunk& chunk : held.source.chunks)
-        readChunk(chunk, held.readers, held.source, groups, fields);
+        readChunk(chunk, readers, held.source, groups, fields);
     return fields.take();
 }
 
-FileMetadata readMetadata(const std::string& path, const MetaGroups& groups)
+std::optional<FileMetadata> ReadMetadataFields(const CFileRef& ref, const MetaGroups& groups, platform::Error* error)
 {
     CAudioFileIO file;
     readAhead(file);
-    requireOK(file.OpenForChunks(referenceTo(path), 0));
-    FileMetadata metadata;
-    if (file.HasChunks()) {
-        const HeldMetadata held = holdChunks(file, groups);
-        metadata = {held.container, fieldsOf(held, groups)};
-    } else {
-        metadata = readTags(file, path);
-    }
-    if (!groups.empty())
-        std::erase_if(metadata.fields, [&](const MetaField& field) { return !isWanted(field.group, groups); });
+    if (!succeeded(file.OpenForChunks(ref, 0), error))
+        return std::nullopt;
+    std::optional<FileMetadata> metadata;
+    if (!file.HasChunks())
+        metadata = readTags(file, ref, error);
+    else if (const auto held = holdChunks(file, groups, error))
+        metadata = FileMetadata{held->container, MetadataFieldsOf(*held, groups)};
+    if (metadata && !groups.empty())
+        std::erase_if(metadata->fields, [&](const MetaField& field) { return !isWanted(field.group, groups); });
     return metadata;
 }
 
-std::vector<std::string> metaGroups()
+std::vector<std::string> MetadataGroupNames()
 {
     std::set<std::string> groups{"info"}; // with "adtl", which goes to "cue", a LIST
     for (const auto& readers : {waveReaders(), aiffReaders(), cafReaders()})

@@ -1,7 +1,10 @@
+#include "audiofile/fields/MetaSource.h"
+
 #include "audiofile/metadata/CAFStringTable.h"
 #include "audiofile/metadata/CueList.h"
 #include "audiofile/metadata/MarkerList.h"
-#include "tool/meta/MetaReaders.h"
+
+#include <algorithm>
 
 const MetaChunk* MetaSource::find(FourCC id) const
 {

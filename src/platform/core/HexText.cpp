@@ -1,4 +1,4 @@
-#include "tool/shared/output/HexText.h"
+#include "platform/core/HexText.h"
 
 std::string hexText(BytesView bytes)
 {

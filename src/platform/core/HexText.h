@@ -2,8 +2,9 @@
 #pragma once
 
 #include "platform/core/Bytes.h"
+#include "platform/core/Export.h"
 
 #include <string>
 
 /// Two small digits for each.
-std::string hexText(BytesView bytes);
+KT_EXPORT std::string hexText(BytesView bytes);

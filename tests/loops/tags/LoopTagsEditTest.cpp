@@ -75,7 +75,7 @@ TEST_F(LoopTagsEdit, SetsWhatIsNamedAndKeepsTheRest)
                              {"transients", Array{Value(5), Value(2)}}}),
                   0)
             << error.description;
-        EXPECT_EQ(edited->changes.size(), container == kAIFF ? 8u : 7u) << "and what follows from them";
+        EXPECT_EQ(edited->changes.size(), 8u) << "and what follows from them";
         ASSERT_EQ(set(path, {{"genre", Value()}, {"signatureTop", 3}, {"signatureBottom", 4}}, {}), 0);
         EXPECT_EQ(valueOf(path, "beatCount"), Value(4));
         EXPECT_EQ(valueOf(path, "key"), Value("F#"));

@@ -1,5 +1,7 @@
 #include "tool/shared/output/ClockTime.h"
 
+#include "platform/core/DateText.h"
+
 #include <fmt/format.h>
 
 #include <algorithm>
@@ -7,25 +9,7 @@
 #include <cmath>
 #include <cstdint>
 #include <cstdlib>
-#include <ctime>
 #include <string_view>
-
-namespace {
-
-template <class Convert>
-std::string calendarText(const std::optional<platform::Date>& date, const char* format, Convert convert)
-{
-    constexpr double kUnixTimeOf2001 = 978'307'200, kFarthest = 1e12;
-    if (!date || !(std::abs(date->secondsSince2001) < kFarthest))
-        return "";
-    std::tm parts = {};
-    char text[32];
-    const auto seconds = static_cast<std::time_t>(std::floor(date->secondsSince2001 + kUnixTimeOf2001));
-    const bool isKnown = convert(&seconds, &parts) != nullptr;
-    return isKnown ? std::string(text, std::strftime(text, sizeof text, format, &parts)) : "";
-}
-
-} // namespace
 
 std::string clockText(double seconds, int decimals, ShowHours showHours)
 {
@@ -87,10 +71,10 @@ std::optional<SoundLength> soundLengthFromText(const std::string& text)
 
 std::string dateText(const std::optional<platform::Date>& date)
 {
-    return calendarText(date, "%Y-%m-%dT%H:%M:%SZ", ::gmtime_r);
+    return date ? platform::dateText(*date) : "";
 }
 
 std::string localDateText(const std::optional<platform::Date>& date)
 {
-    return calendarText(date, "%Y-%m-%d %H:%M", ::localtime_r);
+    return date ? platform::localDateText(*date) : "";
 }

@@ -1,9 +1,9 @@
 // Metadata of AIFF and AIFC.
+#include "audiofile/fields/readers/MetaReaders.h"
 #include "audiofile/metadata/AIFFInstrumentChunk.h"
 #include "audiofile/metadata/CommentList.h"
 #include "audiofile/metadata/MarkerList.h"
-#include "tool/meta/MetaReaders.h"
-#include "tool/shared/output/ClockTime.h"
+#include "platform/core/DateText.h"
 
 #include <array>
 
@@ -21,7 +21,7 @@ bool readComments(const MetaChunk& chunk, const MetaSource&, MetaFields& fields)
         const std::string item = itemName("", i);
         const platform::Date date{static_cast<double>(comment.timeStamp) - AIFFComment::kSecondsTo1970 -
                                   kSecondsFrom1970To2001};
-        fields.number(item + "timeStamp", comment.timeStamp, comment.timeStamp == 0 ? "" : dateText(date));
+        fields.number(item + "timeStamp", comment.timeStamp, comment.timeStamp == 0 ? "" : platform::dateText(date));
         if (comment.marker != 0)
             fields.number(item + "marker", comment.marker);
         fields.text(item + "text", comment.text);
@@ -65,7 +65,7 @@ void addLoop(const std::string& name, const AIFFLoop& loop, const MetaSource& so
     }
 }
 
-bool readInstrument(const MetaChunk& chunk, const MetaSource& source, MetaFields& fields)
+bool readAIFFInstrument(const MetaChunk& chunk, const MetaSource& source, MetaFields& fields)
 {
     const auto instrument = AIFFInstrumentChunk::read(chunk.body);
     if (!instrument)
@@ -99,7 +99,7 @@ constexpr MetaReader kAIFFReaders[] = {
     {fourCC("ANNO"), "ANNO", readText},
     {fourCC("COMT"), "comt", readComments},
     {fourCC("MARK"), "mark", readMarkers},
-    {fourCC("INST"), "inst", readInstrument, fourCC("MARK")},
+    {fourCC("INST"), "inst", readAIFFInstrument, fourCC("MARK")},
     {fourCC("MIDI"), "midi", readPreview},
     {fourCC("AESD"), "aesd", readHex},
     {fourCC("APPL"), "appl", readApplication},

@@ -1,11 +1,9 @@
 // Metadata of CAF.
+#include "audiofile/fields/readers/MetaReaders.h"
 #include "audiofile/metadata/CAFInstrumentChunk.h"
 #include "audiofile/metadata/CAFMarkers.h"
 #include "audiofile/metadata/CAFStringTable.h"
 #include "audiofile/metadata/CAFTextPairs.h"
-#include "tool/meta/MetaReaders.h"
-
-#include <fmt/format.h>
 
 namespace {
 
@@ -36,7 +34,7 @@ bool readStrings(const MetaChunk& chunk, const MetaSource&, MetaFields& fields)
     return true;
 }
 
-std::string textOf(const MetaSource& source, std::uint32_t id)
+std::string stringOf(const MetaSource& source, std::uint32_t id)
 {
     const auto found = source.texts().find(id);
     return found != source.texts().end() ? found->second : "";
@@ -52,12 +50,11 @@ void addMarkers(const std::string& name, const std::vector<CAFMarker>& markers, 
             fields.text(item + "type", fourCCText(marker.type));
         fields.frames(item + "position", double{marker.framePosition});
         fields.number(item + "id", std::uint32_t{marker.id});
-        fields.text(item + "name", textOf(source, marker.id));
+        fields.text(item + "name", stringOf(source, marker.id));
         if (const CAFTimecode& code = marker.timecode; code.hours >= 0 && code.subFrameSampleOffset != 0xFFFFFFFF)
-            fields.text(item + "timecode",
-                        fmt::format("{:02}:{:02}:{:02}:{:02}+{}", std::int8_t{code.hours}, std::int8_t{code.minutes},
-                                    std::int8_t{code.seconds}, std::int8_t{code.frames},
-                                    std::uint32_t{code.subFrameSampleOffset}));
+            fields.text(item + "timecode", clockFields({std::int8_t{code.hours}, std::int8_t{code.minutes},
+                                                        std::int8_t{code.seconds}, std::int8_t{code.frames}}) +
+                                               "+" + std::to_string(std::uint32_t{code.subFrameSampleOffset}));
         if (marker.channel != 0)
             fields.number(item + "channel", std::uint32_t{marker.channel});
     }
@@ -91,7 +88,7 @@ bool readRegions(const MetaChunk& chunk, const MetaSource& source, MetaFields& f
             if ((region.flags & flag) != 0)
                 words += (words.empty() ? "" : ", ") + std::string(word);
         fields.number(item + "id", region.id);
-        fields.text(item + "name", textOf(source, region.id));
+        fields.text(item + "name", stringOf(source, region.id));
         fields.number(item + "flags", region.flags, words);
         addMarkers(item + "marker", region.markers, source, fields);
     }
@@ -116,7 +113,7 @@ bool readCAFInstrument(const MetaChunk& chunk, const MetaSource& source, MetaFie
                                        {"releaseRegion", instrument->releaseRegion}})
         if (region != 0xFFFFFFFF)
             fields.number(name, std::uint32_t{region});
-    fields.number("instrumentId", std::uint32_t{instrument->instrumentId}, textOf(source, instrument->instrumentId));
+    fields.number("instrumentId", std::uint32_t{instrument->instrumentId}, stringOf(source, instrument->instrumentId));
     fields.behind(instrument->behind);
     return true;
 }

@@ -1,10 +1,11 @@
+#include "audiofile/fields/readers/MetaReaders.h"
+#include "audiofile/fields/readers/TagReader.h"
 #include "audiofile/metadata/ListChunk.h"
 #include "platform/core/ByteReader.h"
 #include "platform/core/Status.h"
-#include "tool/meta/MetaReaders.h"
-#include "tool/meta/TagReader.h"
 
 #include <algorithm>
+#include <cstdio>
 
 bool readText(const MetaChunk& chunk, const MetaSource&, MetaFields& fields)
 {
@@ -16,6 +17,17 @@ bool readText(const MetaChunk& chunk, const MetaSource&, MetaFields& fields)
 bool anySet(BytesView bytes)
 {
     return std::ranges::any_of(bytes, [](std::byte byte) { return byte != std::byte{0}; });
+}
+
+std::string clockFields(std::initializer_list<int> numbers)
+{
+    std::string text;
+    for (const int number : numbers) {
+        char digits[16];
+        const int size = std::snprintf(digits, sizeof digits, "%s%02d", text.empty() ? "" : ":", number);
+        text.append(digits, static_cast<std::size_t>(size));
+    }
+    return text;
 }
 
 /// SMPTE ST 330: a label, the length of what follows, a number of the instance and one of the material; of 64 bytes

@@ -1,6 +1,6 @@
-#include "tool/meta/MetaFields.h"
+#include "audiofile/fields/readers/MetaFields.h"
 
-#include "tool/shared/output/HexText.h"
+#include "platform/core/HexText.h"
 
 #include <algorithm>
 #include <charconv>

@@ -1,33 +1,13 @@
 // How the metadata chunks of each container become fields.
 #pragma once
 
-#include "tool/meta/MetaFields.h"
+#include "audiofile/fields/MetaSource.h"
+#include "audiofile/fields/readers/MetaFields.h"
 
-#include <bit>
+#include <initializer_list>
 #include <span>
-
-/// All chunks of a file that may be metadata, in their order.
-struct MetaSource {
-    std::vector<MetaChunk> chunks;
-    std::endian order = std::endian::big; // of the numbers in them
-
-    /// The first chunk of an id that is held; null when there is none.
-    const MetaChunk* find(FourCC id) const;
-
-    // What chunks refer to in others, read once however many ask:
-
-    /// The index that a point has in "cue ", by its id.
-    const std::map<std::uint32_t, std::size_t>& cueIndices() const;
-    /// In frames, of the markers of "MARK", by their ids.
-    const std::map<std::int16_t, std::uint32_t>& markerPositions() const;
-    /// Of the texts of "strg", by their ids; not of more bytes than that chunk has, since they may overlap.
-    const std::map<std::uint32_t, std::string>& texts() const;
-
-private:
-    mutable std::optional<std::map<std::uint32_t, std::size_t>> cueIndices_;
-    mutable std::optional<std::map<std::int16_t, std::uint32_t>> markerPositions_;
-    mutable std::optional<std::map<std::uint32_t, std::string>> texts_;
-};
+#include <string>
+#include <string_view>
 
 /// Puts what a chunk says into fields. False, with no field, when it is not what its id promises.
 using MetaRead = bool (*)(const MetaChunk& chunk, const MetaSource& source, MetaFields& fields);
@@ -63,3 +43,5 @@ bool readPeaks(const MetaChunk& chunk, const MetaSource& source, MetaFields& fie
 /// All of a UMID of 64 bytes, the second half of which may be zeros, and its parts: "umid", "umidLabel" …
 void addUMID(const std::string& name, BytesView umid, MetaFields& fields);
 bool anySet(BytesView bytes);
+/// "01:02:03:04", of two digits each, and more where it must be.
+std::string clockFields(std::initializer_list<int> numbers);

@@ -1,8 +1,9 @@
-#include "tool/meta/TagReader.h"
+#include "audiofile/fields/readers/TagReader.h"
 
 #include "audiofile/FileWindow.h"
-#include "tool/shared/input/InputFile.h"
-#include "tool/shared/output/Failure.h"
+#include "audiofile/SoundProblem.h"
+#include "media/containers/AudioHandle.h"
+#include "platform/core/Status.h"
 
 #include <algorithm>
 #include <array>
@@ -25,6 +26,28 @@ std::string_view groupOf(std::string_view system)
     return found == kSystems.end() ? "tag" : found->second;
 }
 
+/// Whether it is an audio file of any kind, whose sound can be had.
+bool isAudio(const CFileRef& ref, platform::Error* error)
+{
+    const auto fail = [error](std::string description) {
+        return platform::fail(error, kMetadataErrorDomain, static_cast<std::int64_t>(MetadataError::noAudio),
+                              std::move(description));
+    };
+    CAudioFileIO audio;
+    if (const std::int32_t status = audio.Open(ref, 0); status != kStatusOK)
+        return platform::fail(error, platform::ErrorDomain::status, status, StatusText(status));
+    platform::Error why;
+    std::int32_t status = audio.InfoStatus();
+    if (status == platform::AudioHandle::kFormatNotSupported)
+        status = audio.OpenDecoder(&why);
+    if (status == kStatusOK && (audio.Info().fileType != 0 || audio.InfoStatus() != kStatusOK))
+        return true;
+    if (status == platform::AudioHandle::kFormatNotSupported && why.code == status)
+        return fail(why.description);
+    const ContainerProblem problem = SoundProblem(audio);
+    return fail(problem ? problem.Description() : StatusText(status));
+}
+
 } // namespace
 
 void addTag(const platform::EmbeddedTag& tag, MetaFields& fields)
@@ -35,25 +58,26 @@ void addTag(const platform::EmbeddedTag& tag, MetaFields& fields)
         fields.preview(tag.key, tag.head, tag.size, tag.pictureKind.empty() ? tag.mimeType : tag.pictureKind);
 }
 
-FileMetadata readTags(CAudioFileIO& file, const std::string& path)
+std::optional<FileMetadata> readTags(CAudioFileIO& file, const CFileRef& ref, platform::Error* error)
 {
     const CFileBytes bytes(file);
     std::vector<platform::EmbeddedTag> tags;
-    platform::Error error;
+    platform::Error why;
     const std::int32_t status =
-        platform::readEmbeddedTags(bytes, static_cast<std::uint64_t>(file.GetEOF()), tags, &error);
-    if (tags.empty()) {
-        CAudioFileIO audio;
-        openAudio(audio, path);
+        platform::readEmbeddedTags(bytes, static_cast<std::uint64_t>(file.GetEOF()), tags, &why);
+    if (tags.empty() && !isAudio(ref, error))
+        return std::nullopt;
+    if (status != kStatusOK) {
+        platform::fail(error, kMetadataErrorDomain, static_cast<std::int64_t>(MetadataError::badTag),
+                       std::move(why.description));
+        return std::nullopt;
     }
-    if (status != kStatusOK)
-        throw Failure(error.description);
     MetaFields fields(0);
     for (const platform::EmbeddedTag& tag : tags) {
         fields.enterShared({}, groupOf(tag.system));
         addTag(tag, fields);
     }
-    return {0, fields.take()};
+    return FileMetadata{0, fields.take()};
 }
 
 std::span<const std::string_view> tagGroups()

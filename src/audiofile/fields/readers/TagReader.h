@@ -2,16 +2,17 @@
 #pragma once
 
 #include "audiofile/CAudioFileIO.h"
+#include "audiofile/fields/FileMetadata.h"
+#include "audiofile/fields/readers/MetaFields.h"
 #include "media/tags/EmbeddedTags.h"
-#include "tool/meta/FileMetadata.h"
 
 #include <span>
 
 /// The values of a tag as fields of what was entered, each under its key.
 void addTag(const platform::EmbeddedTag& tag, MetaFields& fields);
 
-/// Throws Failure; for what is no audio file that of `info`.
-FileMetadata readTags(CAudioFileIO& file, const std::string& path);
+/// Of the open file `ref`. None for what is no audio file.
+std::optional<FileMetadata> readTags(CAudioFileIO& file, const CFileRef& ref, platform::Error* error);
 
 /// The groups of their fields, in small letters.
 std::span<const std::string_view> tagGroups();

@@ -1,4 +1,5 @@
 // Metadata of WAVE, RF64, BW64, RIFX and Wave64.
+#include "audiofile/fields/readers/MetaReaders.h"
 #include "audiofile/metadata/AcidChunk.h"
 #include "audiofile/metadata/AssociatedDataList.h"
 #include "audiofile/metadata/BroadcastExtension.h"
@@ -8,9 +9,6 @@
 #include "audiofile/metadata/InstrumentChunk.h"
 #include "audiofile/metadata/PlaylistChunk.h"
 #include "audiofile/metadata/SamplerChunk.h"
-#include "tool/meta/MetaReaders.h"
-
-#include <fmt/format.h>
 
 #include <array>
 
@@ -52,7 +50,7 @@ bool readBroadcast(const MetaChunk& chunk, const MetaSource& source, MetaFields&
     addReserved(chunk.body, bext->version, fields);
     const auto history = bext->codingHistoryLines();
     for (std::size_t i = 0; i < history.size(); ++i)
-        fields.text(fmt::format("codingHistory[{}]", i), history[i]);
+        fields.text("codingHistory[" + std::to_string(i) + "]", history[i]);
     return true;
 }
 
@@ -137,8 +135,9 @@ bool readSampler(const MetaChunk& chunk, const MetaSource& source, MetaFields& f
     fields.number("midiPitchFraction", std::uint32_t{sampler->midiPitchFraction}, "1/2^32 semitones");
     fields.number("smpteFormat", std::uint32_t{sampler->smpteFormat},
                   sampler->smpteFormat == 0 ? "none" : "frames a second");
-    fields.text("smpteOffset", fmt::format("{:02}:{:02}:{:02}:{:02}", static_cast<std::int8_t>(offset >> 24),
-                                           offset >> 16 & 0xFF, offset >> 8 & 0xFF, offset & 0xFF));
+    fields.text("smpteOffset",
+                clockFields({static_cast<std::int8_t>(offset >> 24), static_cast<int>(offset >> 16 & 0xFF),
+                             static_cast<int>(offset >> 8 & 0xFF), static_cast<int>(offset & 0xFF)}));
     for (std::size_t i = 0; i < sampler->loops.size(); ++i) {
         const SamplerLoop& loop = sampler->loops[i];
         const std::string item = itemName("loop", i);
@@ -225,7 +224,7 @@ void addAssociatedData(const AssociatedDataList& list, const MetaSource& source,
     const auto& indices = source.cueIndices();
     const auto itemOf = [&](std::uint32_t cueId) {
         const auto found = indices.find(cueId);
-        return found != indices.end() ? itemName("", found->second) : fmt::format("[id {}].", cueId);
+        return found != indices.end() ? itemName("", found->second) : "[id " + std::to_string(cueId) + "].";
     };
     for (const CueText& label : list.labels())
         fields.text(itemOf(label.cueId) + "label", label.text);

@@ -1,8 +1,6 @@
 // Chunks that hold XML documents.
+#include "audiofile/fields/readers/MetaReaders.h"
 #include "platform/XMLParser.h"
-#include "tool/meta/MetaReaders.h"
-
-#include <fmt/format.h>
 
 #include <algorithm>
 #include <deque>
@@ -156,7 +154,7 @@ bool readADM(const MetaChunk& chunk, const MetaSource&, MetaFields& fields)
     std::string summary;
     for (const auto& [kind, count] : counter.counts)
         if (count != 0)
-            summary += fmt::format("{}{} {}", summary.empty() ? "" : ", ", count, kind);
+            (summary += (summary.empty() ? "" : ", ") + std::to_string(count) + " ") += kind;
     fields.text("", summary.empty() ? "no ADM elements" : summary);
     return true;
 }

@@ -1,4 +1,4 @@
-// What a host may hear of a document's problems, and what it may let pass.
+// Problems of a document, as a host hears of them, and which of them it may let pass.
 #pragma once
 
 #include "platform/XMLParser.h"
@@ -6,9 +6,9 @@
 #include <functional>
 #include <string>
 
-/// One problem. It is told before it is raised, or in its place where an option lets it pass.
+/// One problem. The handler hears of it before the exception is raised, or instead where an option lets it pass.
 struct ADMDiagnostic {
-    /// The kind of what is not well-formed, or could not be read.
+    /// The kind of a document that is not well-formed, or whose bytes could not be read.
     static constexpr const char* kParseError = "ParseError";
 
     platform::XMLPosition position; // of the element, or where the parser met it; zeros when unknown
@@ -17,17 +17,18 @@ struct ADMDiagnostic {
     std::string text;               // the exception's reason, or the parser's message
 };
 
+/// Called on the parsing thread for each problem. What it throws leaves the parse.
 using ADMDiagnosticsHandler = std::function<void(const ADMDiagnostic&)>;
 
-/// Everything is off unless a host turns it on; what is not named here stays strict.
+/// All are off unless a host turns them on; what is not named here stays strict.
 struct ADMDocumentOptions {
-    /// A reference to what is not there leaves a null link.
+    /// A reference to an element that does not exist leaves a null link.
     bool continuePastUnresolvedReferences = false;
-    /// A block of another type than DirectSpeakers and Objects is left out.
+    /// A block of a type other than DirectSpeakers and Objects is left out.
     bool skipUnsupportedBlocks = false;
-    /// "ATU_00000000" means no track, and leaves a null link without a problem.
+    /// "ATU_00000000" means no track: it leaves a null link and is no problem.
     bool silentTrack = false;
-    /// The accessors that begin with "exact" read a fraction of a second as decimals; else they give what the others
-    /// do.
+    /// The accessors that begin with "exact" read the fraction of a second as decimals; otherwise they give what the
+    /// accessors without "exact" do.
     bool exactFractions = false;
 };

@@ -1,5 +1,5 @@
 // An ADM document (ITU-R BS.2076; the XML in the "axml" chunk of a broadcast wave file) as a graph of elements. The
-// document owns every element; the links between them are filled in at the end of the parse. It is made, parsed once,
+// document owns every element and fills in the links between them at the end of the parse. It is made, parsed once,
 // then read.
 #pragma once
 
@@ -24,40 +24,54 @@
 #include <typeinfo>
 #include <vector>
 
+/// A graph of ADM elements, which it owns. Errors of the XML end the parse with false; errors of ADM raise
+/// ADMException.
 class KT_EXPORT ADMDocument : private platform::XMLHandler, public ADMElementResolver {
 public:
-    /// Null, with a line in the log, without data.
+    /// A document over bytes that it takes over, not parsed yet. Null, with a line in the log, when there are no
+    /// data.
     static std::unique_ptr<ADMDocument> initWithADMData(std::optional<Bytes> data);
-    /// `initWithADMStream:`. Does not parse.
+    /// `initWithADMStream:`. Takes the stream over; does not parse.
     explicit ADMDocument(std::unique_ptr<platform::InputStream> stream);
     ~ADMDocument() override;
 
+    /// Called for each problem; empty means none. Set it before the parse.
     void setDiagnosticsHandler(ADMDiagnosticsHandler handler) { diagnosticsHandler_ = std::move(handler); }
-    /// Called for every 64 KiB or less with the bytes read so far; false cancels, and the parse gives false with
-    /// kStatusUserCancelled.
+    /// Called with the number of bytes read so far, after every piece of 64 KiB or less. Its false cancels: the parse
+    /// returns false with kStatusUserCancelled.
     void setProgressHandler(platform::XMLParser::ProgressHandler handler) { progressHandler_ = std::move(handler); }
+    /// What is let pass; all off at first.
     const ADMDocumentOptions& options() const { return options_; }
+    /// Sets options(), for the next parse.
     void setOptions(const ADMDocumentOptions& options) { options_ = options; }
 
-    /// Parses the stream that the document was made with.
+    /// Parses the stream that the document was made with, as parseStream() does.
     bool parse();
-    /// `parseStream:`. False, with `parseError`, for what is not well-formed; the elements that were complete stay,
-    /// their links are not filled. Raises ADMException for what is well-formed but not ADM.
+    /// `parseStream:`. False, with parseError(), when the stream is not well-formed: complete elements stay, their
+    /// links are not filled. Raises ADMException when it is well-formed but not ADM.
     bool parseStream(platform::InputStream& stream);
-    /// There is no library of common definitions: true.
+    /// Always true: the library has no common definitions.
     bool parseCommonDefinitions() { return true; }
 
-    /// Each in document order; an element whose ID comes again takes the place of the one before.
+    /// The programmes in document order. An element whose ID comes again takes the place of the earlier one, in this
+    /// table and the others.
     const ADMElementTable<ADMAudioProgramme>& audioProgrammes() const { return audioProgrammes_; }
+    /// The contents in document order.
     const ADMElementTable<ADMAudioContent>& audioContents() const { return audioContents_; }
+    /// The objects in document order.
     const ADMElementTable<ADMAudioObject>& audioObjects() const { return audioObjects_; }
+    /// The track formats in document order.
     const ADMElementTable<ADMAudioTrackFormat>& audioTrackFormats() const { return audioTrackFormats_; }
+    /// The channel formats in document order.
     const ADMElementTable<ADMAudioChannelFormat>& audioChannelFormats() const { return audioChannelFormats_; }
+    /// The pack formats in document order.
     const ADMElementTable<ADMAudioPackFormat>& audioPackFormats() const { return audioPackFormats_; }
+    /// The stream formats in document order.
     const ADMElementTable<ADMAudioStreamFormat>& audioStreamFormats() const { return audioStreamFormats_; }
+    /// The track UIDs in document order.
     const ADMElementTable<ADMAudioTrackUID>& audioTrackUIDs() const { return audioTrackUIDs_; }
 
-    /// Each stores the element under its own ID and replaces the one that is there.
+    /// Each stores the element under its own ID, in the place of one that is there.
     void addAudioProgramme(std::unique_ptr<ADMAudioProgramme> element);
     void addAudioContent(std::unique_ptr<ADMAudioContent> element);
     void addAudioObject(std::unique_ptr<ADMAudioObject> element);
@@ -67,29 +81,31 @@ public:
     void addAudioStreamFormat(std::unique_ptr<ADMAudioStreamFormat> element);
     void addAudioTrackUID(std::unique_ptr<ADMAudioTrackUID> element);
 
-    /// Fills the links of all elements; runs at the end of a well-formed document.
+    /// Fills the links of all elements. Runs at the end of a well-formed document.
     void resolveIDRefs();
-    /// Raises MissingDefinition for an ID that is not there, MalformedIDString for one whose prefix cannot be told.
-    /// Null for no ID and for an empty prefix.
+    /// The element of an ID; null for no ID and for an empty prefix. Raises MissingDefinition for an ID that the
+    /// document does not have, MalformedIDString for one without a prefix.
     ADMElement* findADMElementRef(std::optional<std::string_view> identifier,
                                   std::optional<std::string_view> typePrefix = {}) override;
     void expectADMElementRef(std::string_view identifier, std::string_view typePrefix) override;
-    /// Of this class itself; what the look-up of a derived one gives is not known.
+    /// True for this very class; a derived class may look elements up elsewhere.
     bool findsClassesOfPrefixes() const override { return typeid(*this) == typeid(ADMDocument); }
 
+    /// The stream that the document was made with; it stays the document's.
     platform::InputStream* inputStream() const { return inputStream_.get(); }
-    /// Null unless a parse runs.
+    /// The running parser; null unless a parse runs.
     platform::XMLParser* parser() const { return parser_.get(); }
-    /// Null when there was none.
+    /// Why the last parse returned false; null when it did not.
     const platform::Error* parseError() const { return parseError_ ? &*parseError_ : nullptr; }
 
-    /// The elements that are open in the parse, innermost last. A document that failed in mid-parse keeps them until
-    /// the next.
+    /// The elements that are open in the parse, innermost last. A document whose parse failed keeps them until the
+    /// next parse.
     const std::vector<std::unique_ptr<ADMElement>>& currentElements() const { return currentElements_; }
+    /// The sub-elements that are open in the parse, innermost last; valid until the parse goes on.
     std::span<const std::unique_ptr<ADMGenericElement>> currentGenericElements() const;
-    /// The element that the innermost one stands in; null when there is none.
+    /// The element around the innermost open one; null when there is none.
     ADMElement* parentElement() const;
-    /// Takes the innermost element off; null when there is none.
+    /// Removes the innermost open element and hands it over; null when there is none.
     std::unique_ptr<ADMElement> popLastElement();
 
 private:

@@ -1,4 +1,4 @@
-// A dictionary of the elements of one kind: from ID to element, which it owns, in the order of the document.
+// A dictionary of the elements of one kind, in document order: from ID to element, which it owns.
 #pragma once
 
 #include <algorithm>
@@ -17,8 +17,8 @@
 #include <utility>
 #include <vector>
 
-/// A lookup waits for memory once: the ID and the element's address lie side by side, two of them in a cache line, and
-/// the element itself is not touched.
+/// A dictionary by ID, in document order; it owns the elements. A lookup waits for memory once: the ID and the
+/// element's address lie side by side, two of them in a cache line, and the element itself is not touched.
 template <class Element>
 class ADMElementTable {
     using Owners = std::vector<std::unique_ptr<Element>>;
@@ -37,15 +37,15 @@ public:
         return found == others_.end() ? nullptr : elements_[found->second].get();
     }
 
-    /// Asks memory for the slot that find() will look at first.
+    /// Fetches the memory of the slot that find() looks at first.
     void prefetch(std::string_view id) const
     {
         if (id.size() <= kShortID && !lines_.empty())
             __builtin_prefetch(&slotAt(firstSlotOf(id) & (slotCount() - 1)));
     }
 
-    /// One that is already there under this ID is replaced, and the new one takes its place in the order. It lives on
-    /// until the table goes, since others may link to it.
+    /// Stores an element. One that is already there under this ID is replaced, and the new one takes its place in the
+    /// order. The old one lives as long as the table, since others may link to it. Throws std::bad_alloc.
     void insert(std::string_view id, std::unique_ptr<Element> element)
     {
         if (elements_.size() == std::numeric_limits<std::uint32_t>::max())
@@ -67,7 +67,7 @@ public:
         place(id, at, entry);
     }
 
-    /// Goes over the elements themselves.
+    /// A forward iterator over the elements themselves.
     class Iterator {
     public:
         using value_type = Element;
@@ -77,6 +77,7 @@ public:
         using reference = Element&;
 
         Iterator() = default;
+        /// Made by begin() and end().
         explicit Iterator(typename Owners::const_iterator at) : at_(at) {}
         Element& operator*() const { return **at_; }
         Element* operator->() const { return at_->get(); }
@@ -100,9 +101,9 @@ public:
     Iterator end() const { return Iterator(elements_.end()); }
 
 private:
-    // All IDs that follow the standard are shorter.
+    // Longer than every ID that follows the standard.
     static constexpr std::size_t kShortID = 19;
-    // So many slots are looked at for an ID: a document could be made of IDs that all belong into one.
+    // How many slots an ID may lie away from its first: a document could hold IDs that all hash to one slot.
     static constexpr std::size_t kReach = 64;
     static constexpr std::size_t kNoSlot = std::numeric_limits<std::size_t>::max();
 
@@ -126,7 +127,7 @@ private:
         std::uint32_t entry = 0;    // where it stands in the order
         Element* element = nullptr; // null: the slot is free
     };
-    /// Of the cache: who looks into one of the slots has the other.
+    /// A cache line: reading one of its slots fetches the other.
     struct alignas(64) Line {
         std::array<Slot, 2> slots;
     };
@@ -136,9 +137,9 @@ private:
     Slot& slotAt(std::size_t at) { return lines_[at / 2].slots[at % 2]; }
     const Slot& slotAt(std::size_t at) const { return lines_[at / 2].slots[at % 2]; }
 
-    /// The first of a line, to be masked.
+    /// The first slot of a line, before the mask.
     static std::size_t firstSlotOf(std::string_view id) { return std::hash<std::string_view>()(id) & ~std::size_t{1}; }
-    /// The slot that holds this ID, or the free one where it belongs; `kNoSlot` when others have all within reach.
+    /// The slot that holds this ID, or the free one where it belongs; `kNoSlot` when other IDs fill all within reach.
     std::size_t slotOf(std::string_view id) const
     {
         const std::size_t mask = slotCount() - 1;

@@ -1,4 +1,4 @@
-// The identifiers of ITU-R BS.2076: a prefix, which tells the kind of element, and hexadecimal fields.
+// The identifiers of ITU-R BS.2076: a prefix, which names the kind of element, and hexadecimal fields.
 #pragma once
 
 #include "adm/ADMTypes.h"
@@ -8,17 +8,17 @@
 #include <string>
 #include <string_view>
 
-inline constexpr const char* kADMAudioProgrammePrefix = "APR";
-inline constexpr const char* kADMAudioContentPrefix = "ACO";
-inline constexpr const char* kADMAudioObjectPrefix = "AO";
-inline constexpr const char* kADMAudioPackFormatPrefix = "AP";
-inline constexpr const char* kADMAudioChannelFormatPrefix = "AC";
-inline constexpr const char* kADMAudioStreamFormatPrefix = "AS";
-inline constexpr const char* kADMAudioTrackFormatPrefix = "AT";
-inline constexpr const char* kADMAudioTrackUIDPrefix = "ATU";
-inline constexpr const char* kADMAudioBlockPrefix = "AB";
+inline constexpr const char* kADMAudioProgrammePrefix = "APR";    // of audioProgramme
+inline constexpr const char* kADMAudioContentPrefix = "ACO";      // of audioContent
+inline constexpr const char* kADMAudioObjectPrefix = "AO";        // of audioObject
+inline constexpr const char* kADMAudioPackFormatPrefix = "AP";    // of audioPackFormat
+inline constexpr const char* kADMAudioChannelFormatPrefix = "AC"; // of audioChannelFormat
+inline constexpr const char* kADMAudioStreamFormatPrefix = "AS";  // of audioStreamFormat
+inline constexpr const char* kADMAudioTrackFormatPrefix = "AT";   // of audioTrackFormat
+inline constexpr const char* kADMAudioTrackUIDPrefix = "ATU";     // of audioTrackUID
+inline constexpr const char* kADMAudioBlockPrefix = "AB";         // of audioBlockFormat
 
-/// Splits an ID; any pointer may be null, and what the prefix has no field for is left as it is.
+/// Splits an ID. Any pointer may be null; a value for which the prefix has no field is left as it is.
 ///
 /// | prefix | form | fields |
 /// |---|---|---|
@@ -30,7 +30,7 @@ inline constexpr const char* kADMAudioBlockPrefix = "AB";
 /// | AVS | AVS_xxxx_zzzz | index, subIndex |
 ///
 /// The prefix is given in upper case. A field is read, and so checked, when it is asked for; the eight digits of AP,
-/// AC, AS, AT and AB always. Text behind the last field is ignored. Raises MalformedIDString.
+/// AC, AS, AT and AB always. Text after the last field is ignored. Raises MalformedIDString.
 KT_EXPORT void ADMParseIdentifier(std::string_view identifier, std::string* prefix, ADMType_t* type,
                                   std::uint32_t* index, std::uint32_t* subIndex);
 
@@ -39,10 +39,10 @@ KT_EXPORT void ADMRequirePrefix(std::string_view prefix, std::string_view expect
 
 namespace adm {
 
-inline constexpr std::size_t kLongestPrefix = 3;
-inline constexpr std::uint32_t kNoPrefix = 1; // packed; each character is put behind what is there
+inline constexpr std::size_t kLongestPrefix = 3; // of the prefixes above, in characters
+inline constexpr std::uint32_t kNoPrefix = 1;    // packed; each character is put behind what is there
 
-/// The characters of a prefix in one number, which is quick to compare; 0 for what is too long for one.
+/// The characters of a prefix in one number, which compares fast; 0 for a text longer than kLongestPrefix.
 constexpr std::uint32_t packedPrefix(std::string_view prefix)
 {
     if (prefix.size() > kLongestPrefix)

@@ -7,12 +7,13 @@
 #include <string>
 #include <string_view>
 
-/// Language to text.
+/// Language code to text.
 using ADMLabels = std::map<std::string, std::string>;
 
 namespace adm {
 
-/// Stores a label under its "language"; one without is left out.
+/// Stores a label under its attribute "language", in the place of an earlier one; without that attribute it is
+/// ignored.
 void addLabel(ADMLabels& labels, std::string_view value, const platform::XMLAttributes& attributes);
 
 } // namespace adm

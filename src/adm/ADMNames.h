@@ -1,5 +1,5 @@
-// Names compared with those that are known when compiling. There are a dozen such comparisons for every element of a
-// document, and a call for each would cost more than what it does.
+// Names compared with those that are known at compile time. An element needs a dozen such comparisons, and a call for
+// each would cost more than the comparison.
 #pragma once
 
 #include "platform/XMLParser.h"
@@ -11,6 +11,7 @@
 
 namespace adm {
 
+/// Whether the text is that name.
 template <std::size_t Size>
 bool is(std::string_view text, const char (&name)[Size])
 {

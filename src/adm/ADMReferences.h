@@ -1,4 +1,4 @@
-// References from one element to others: the IDs as they stand in the document, and the links found for them.
+// References from one element to others: the IDs as the document has them, and the links found for them.
 #pragma once
 
 #include "adm/ADMElement.h"
@@ -14,10 +14,11 @@
 
 namespace adm {
 
-/// So many look-ups ahead of one it is told what will be looked for: each waits for memory otherwise.
+/// How far ahead an ID is announced before it is looked up; each look-up waits for memory otherwise.
 inline constexpr std::size_t kAnnounced = 8;
 
-/// What a resolver found for the prefix of this class. A cast that asks the element would wait for its memory.
+/// The resolver's result as the class that the prefix names. A cast that asks the element itself would wait for its
+/// memory.
 template <class Element>
 Element* elementAs(ADMElement* found, const ADMElementResolver& resolver)
 {
@@ -26,12 +27,13 @@ Element* elementAs(ADMElement* found, const ADMElementResolver& resolver)
 
 } // namespace adm
 
-/// Any number of them, in the order of the document.
+/// Any number of references, in document order.
 template <class Element>
 struct ADMReferenceList {
-    std::vector<std::string> ids;
-    std::vector<Element*> elements; // null where an ID was let pass that names nothing
+    std::vector<std::string> ids;   // as written
+    std::vector<Element*> elements; // null where an ID that names nothing was let pass
 
+    /// Appends the elements of all IDs. Raises what the resolver raises.
     void resolve(ADMElementResolver& resolver, std::string_view prefix)
     {
         elements.reserve(elements.size() + ids.size());
@@ -41,7 +43,7 @@ struct ADMReferenceList {
             elements.push_back(adm::elementAs<Element>(resolver.findADMElementRef(ids[i], prefix), resolver));
         }
     }
-    /// What resolve() does not tell of itself.
+    /// Announces the first IDs, which resolve() looks up without having announced them.
     void announce(ADMElementResolver& resolver, std::string_view prefix) const
     {
         for (std::size_t i = 0; i < std::min(adm::kAnnounced, ids.size()); ++i)
@@ -49,16 +51,18 @@ struct ADMReferenceList {
     }
 };
 
-/// At most one.
+/// At most one reference.
 template <class Element>
 struct ADMReference {
-    std::optional<std::string> id;
-    Element* element = nullptr;
+    std::optional<std::string> id; // null when the document gives none
+    Element* element = nullptr;    // null until it is resolved, and for none
 
+    /// Fills in the element. Raises what the resolver raises.
     void resolve(ADMElementResolver& resolver, std::string_view prefix)
     {
         element = adm::elementAs<Element>(resolver.findADMElementRef(id, prefix), resolver);
     }
+    /// Announces the ID, if there is one.
     void announce(ADMElementResolver& resolver, std::string_view prefix) const
     {
         if (id)
@@ -68,7 +72,7 @@ struct ADMReference {
 
 namespace adm {
 
-/// "(AC_00031001, AC_00031002)": links by their IDs, as elements may link each other in circles.
+/// "(AC_00031001, AC_00031002)": links by their IDs, since elements may link each other in circles.
 template <class Element>
 std::string linksText(const std::vector<Element*>& elements)
 {
@@ -78,9 +82,11 @@ std::string linksText(const std::vector<Element*>& elements)
             text += ", ";
         text += element == nullptr ? "(null)" : element->elementID();
     }
+    /// The ID of a link; "(null)" for none.
     return text += ")";
 }
 
+/// The ID of a link; "(null)" for none.
 template <class Element>
 std::string linkText(const Element* element)
 {

@@ -1,4 +1,4 @@
-// How the texts of ADM documents are read as numbers, and how debug texts write them: alike in every locale.
+// How the texts of ADM documents are read as numbers, and how debug texts show them: the same in every locale.
 #pragma once
 
 #include <cstdint>
@@ -8,13 +8,15 @@
 
 namespace adm {
 
+/// The text after its leading blanks.
 std::string_view withoutLeadingBlanks(std::string_view text);
 
-/// A decimal integer, blanks ahead of it and text behind it ignored; 0 when there is none, the nearest one when it does
-/// not fit.
+/// A decimal integer; blanks ahead of it and text after it are ignored. 0 when there is none, the nearest 64-bit
+/// number when it does not fit.
 std::int64_t integerOf(std::string_view text);
+/// The same in 32 bits.
 std::int32_t integer32Of(std::string_view text);
-/// A decimal number, likewise; infinite when it does not fit.
+/// A decimal number, read the same way; infinite when it does not fit.
 float floatOf(std::string_view text);
 /// Whether the text begins with y, t or a digit other than 0.
 bool booleanOf(std::string_view text);

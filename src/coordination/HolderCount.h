@@ -1,5 +1,5 @@
-// How both kinds of lock count: idle, being acquired, held, idle again. Not a lock by itself: its owner's mutex guards
-// it.
+// The states that both kinds of lock count through: idle, being acquired, held, idle again. Not a lock by itself: its
+// owner's mutex guards it.
 #pragma once
 
 #include <cstdint>
@@ -12,14 +12,17 @@
 #include <utility>
 #include <vector>
 
+/// Holders of one lock, and the handlers that wait for it.
 class HolderCount {
 public:
+    /// Called when a holder has the lock; may be empty.
     using Handler = std::function<void()>;
+    /// What retain() leaves to its caller.
     enum class Retained { held, pending, mustAcquire, full };
 
-    /// One more holder. `held`: the caller calls the handler, outside the mutex. `pending`: an acquisition is under
-    /// way, or calling its handlers, and will call this one behind them. `mustAcquire`: the caller starts the
-    /// acquisition, which will call it. `full`: nothing has happened.
+    /// Adds a holder. `held`: the caller calls the handler, outside the mutex. `pending`: an acquisition is under way
+    /// or calls its handlers, and calls this one after them. `mustAcquire`: the caller starts the acquisition, which
+    /// calls it. `full`: nothing has changed.
     Retained retain(const Handler& handler)
     {
         if (lockCount_ == std::numeric_limits<std::int64_t>::max())
@@ -42,7 +45,7 @@ public:
         return Retained::pending;
     }
 
-    /// One holder less; true when that was the last of a held lock.
+    /// Removes a holder; true when it was the last of a held lock.
     bool release()
     {
         if (creatingLock_) {
@@ -55,7 +58,7 @@ public:
         return lockCount_ > 0 && --lockCount_ == 0;
     }
 
-    /// All holders of a held lock less; true when there were any.
+    /// Removes all holders of a held lock; true when there were any.
     bool reset()
     {
         if (lockCount_ > 0)
@@ -63,7 +66,7 @@ public:
         return lockCount_ > 0 && release();
     }
 
-    /// The lock is had: it counts as held, and its handlers are due, one by one. Then `settle`.
+    /// Ends an acquisition: the lock counts as held, and its handlers are due, one by one. Call settle() afterwards.
     void acquired()
     {
         lockCount_ += 1 + std::exchange(additionalLockCount_, 0);
@@ -75,8 +78,8 @@ public:
         isCallingHandlers_ = true;
     }
 
-    /// The next handler, to be called outside the mutex; none when the last was given. Who retains meanwhile is called
-    /// in turn.
+    /// The next handler, to be called outside the mutex; null after the last. A holder that is added meanwhile is
+    /// called in turn.
     std::optional<Handler> nextHandler()
     {
         isCallingHandlers_ = !dueHandlers_.empty();
@@ -87,7 +90,7 @@ public:
         return next;
     }
 
-    /// Calls what is due, in order; `mutex` is the owner's.
+    /// Calls the due handlers in order; `mutex` is the owner's.
     void callHandlers(std::mutex& mutex)
     {
         for (;;) {
@@ -101,12 +104,12 @@ public:
         }
     }
 
-    /// Ends an acquisition whose last holder had left before it was done, now that its handlers were called; true when
-    /// that leaves a lock that was held without holders. Handlers that retained keep it.
+    /// Called after the handlers of an acquisition whose last holder left before it was done; true when the lock is
+    /// now held without holders. Handlers that retained keep it.
     bool settle() { return std::exchange(owesRelease_, false) && !creatingLock_ && release(); }
 
-    /// The acquisition has failed: nobody is called, and the next holder starts anew. The handlers are given back only
-    /// to be dropped outside the mutex.
+    /// Ends an acquisition that failed: nobody is called, and the next holder starts anew. The handlers are returned
+    /// only to be destroyed outside the mutex.
     std::vector<Handler> failed()
     {
         additionalLockCount_ = 0;
@@ -114,7 +117,9 @@ public:
         return std::exchange(finishedHandlers_, {});
     }
 
+    /// How many holders the held lock has; 0 when it is not held.
     std::int64_t count() const { return lockCount_; }
+    /// Whether the lock is held or being acquired.
     bool isInUse() const { return lockCount_ > 0 || creatingLock_; }
 
 private:

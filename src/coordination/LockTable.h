@@ -1,4 +1,4 @@
-// The process-wide table of a lock class, from a file's key to the lock that all its users share.
+// The process-wide table of a class of locks: from a file's key to the lock that all its users share.
 #pragma once
 
 #include "platform/FileCoordination.h"
@@ -8,9 +8,11 @@
 #include <mutex>
 #include <vector>
 
+/// All locks of a class. Any thread may use it.
 template <class Lock>
 class LockTable {
 public:
+    /// The registered lock; null for none.
     std::shared_ptr<Lock> find(const platform::CoordinatedItem& item)
     {
         const std::lock_guard guard(mutex_);
@@ -18,7 +20,8 @@ public:
         return !item.isValid() || found == entries_.end() ? nullptr : found->second.lock;
     }
 
-    /// The registered lock, or the one that `make` gives, registered; null, and nothing registered, when that is null.
+    /// The registered lock, or a new one by `make`, which is registered; null, and nothing registered, when `make`
+    /// gives null.
     template <class Make>
     std::shared_ptr<Lock> findOrAdd(const platform::CoordinatedItem& item, const Make& make)
     {
@@ -27,7 +30,7 @@ public:
         return entry != nullptr ? entry->lock : nullptr;
     }
 
-    /// The same, and `use` of the lock, during which it cannot be removed.
+    /// The same, then calls `use` with the lock, which cannot be removed meanwhile.
     template <class Make, class Use>
     void findOrAddAndUse(const platform::CoordinatedItem& item, const Make& make, const Use& use)
     {
@@ -36,7 +39,7 @@ public:
             use(*user.lock);
     }
 
-    /// Takes the file's lock out, unless it is in use: the lock that is registered no more, or null.
+    /// Removes the file's lock unless it is in use. The removed lock, or null.
     std::shared_ptr<Lock> removeUnused(const platform::CoordinatedItem& item)
     {
         const std::lock_guard guard(mutex_);
@@ -48,6 +51,7 @@ public:
         return removed;
     }
 
+    /// Removes all locks that are not in use, and returns them.
     std::vector<std::shared_ptr<Lock>> removeAllUnused()
     {
         std::vector<std::shared_ptr<Lock>> removed;
@@ -61,6 +65,7 @@ public:
         return removed;
     }
 
+    /// The registered locks, in the order of their keys.
     std::vector<std::shared_ptr<Lock>> all()
     {
         std::vector<std::shared_ptr<Lock>> locks;
@@ -78,7 +83,7 @@ private:
         bool isUnused() const { return users == 0 && !lock->isInUse(); }
     };
 
-    /// Counts as a user of the item's entry, also when what it does ends with an exception of the host's.
+    /// A user of the item's entry, for as long as it lives, even if an exception of the host ends its work.
     struct User {
         LockTable& table;
         const platform::SHA256Digest key;

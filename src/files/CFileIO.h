@@ -8,25 +8,25 @@
 #include <cstdint>
 #include <memory>
 
-/// Open modes, a bit set; other bits are stored and ignored.
+/// Open modes, a bit set. Other bits are stored and ignored.
 enum : unsigned int {
     kFileIOReadWrite = 0x0001,   // a missing file is created
     kFileIOInteraction = 0x0004, // the user may be asked while an alias is resolved
     kFileIOMemory = 0x8000,      // a memory file: the cache block is its content
 };
 
-/// The state of a file: as long as it stays equal the bytes are the same, unless they changed again within one tick of
-/// the system's clock.
+/// The state of a file. While it stays equal the bytes are the same, unless they changed again within one tick of the
+/// system's clock.
 struct FileStamp {
-    long long length = 0;
-    long long changed = 0; // when content or attributes changed last, in nanoseconds since 1970
+    long long length = 0;  // in bytes
+    long long changed = 0; // when content or attributes last changed, in nanoseconds since 1970
 
     bool operator==(const FileStamp&) const = default;
 };
 
-/// The base names the open file, its links resolved. Operations return status codes (platform/core/Status.h); a system
-/// error comes back as PosixErrorToOSErr maps it. Owns its descriptor and its write cache, shares its read cache; one
-/// thread at a time.
+/// One open file. The base names it, links resolved. Operations return status codes (platform/core/Status.h), system
+/// errors as PosixErrorToOSErr maps them. Owns its descriptor and its write cache, shares its read cache; one thread
+/// at a time.
 ///
 /// Bytes in the write cache belong at the mark and are not in the file: call FlushWCache before moving the mark or
 /// reading what was written.
@@ -41,79 +41,92 @@ public:
 
     // What replaces the file is virtual: derived classes know things of the one that is open.
 
-    /// The state of a new object: closed, caches dropped, nothing flushed.
+    /// Resets to the state of a new object: closed, caches dropped, nothing flushed.
     virtual void Init();
-    /// Opens what `ref` names, an alias file or symbolic link resolved. kStatusFileNotFound for a missing file without
-    /// kFileIOReadWrite (with it, the file is created with permissions 0644), kStatusParameterError for a folder,
-    /// kStatusNotAFile for a FIFO, socket or device. A memory file ignores `ref` and takes the cache block for its
+    /// Opens what `ref` names, an alias file or symbolic link resolved. kStatusFileNotFound for a missing file
+    /// without kFileIOReadWrite (with it, the file is created with permissions 0644), kStatusParameterError for a
+    /// folder, kStatusNotAFile for a FIFO, socket or device. A memory file ignores `ref`; the cache block is its
     /// content. A failed open leaves the object closed.
     virtual std::int32_t Open(const CFileRef& ref, unsigned int mode);
+    /// Open without kFileIOReadWrite.
     std::int32_t OpenRead(const CFileRef& ref, unsigned int mode) { return Open(ref, mode & ~kFileIOReadWrite); }
+    /// Open with kFileIOReadWrite.
     std::int32_t OpenReadWrite(const CFileRef& ref, unsigned int mode) { return Open(ref, mode | kFileIOReadWrite); }
-    /// Flushes and frees the write cache, closes, resets the base. The cache block is kept. The object is closed
-    /// whatever is returned: the failure to flush, else that to close.
+    /// Flushes and frees the write cache, closes, resets the base, and keeps the cache block. The object is closed
+    /// whatever the result: the status of a failed flush, else of closing.
     virtual std::int32_t Close();
 
-    /// At a position, through the read cache; `actual` (may be null) receives the bytes delivered, also on failure.
+    /// Reads at a position, through the read cache. `actual` (may be null) gets the number of bytes, also on failure.
     /// kStatusEndOfFile when the file ends before `count` bytes.
     std::int32_t Read(void* buffer, long long position, long count, long* actual);
-    /// At the mark, which advances on success.
+    /// Reads at the mark, which advances on success.
     std::int32_t Read(void* buffer, long count);
-    /// At the mark, which advances by what was delivered; `*count` becomes that number.
+    /// Reads at the mark, which advances by what was delivered; `*count` becomes that number.
     std::int32_t Read(void* buffer, long* count);
-    /// As many bytes as the file is long, from the mark, into a new block that the caller gives to `free`.
+    /// Reads as many bytes as the file is long, from the mark, into a new block that the caller frees with `free`.
     std::int32_t Read(void** data, long* size);
-    /// Moves the mark back; kStatusBeforeStart, and the mark at 0, when that would go below 0.
+    /// Moves the mark back. kStatusBeforeStart, and the mark at 0, when that goes below 0.
     std::int32_t UnRead(long count);
 
-    /// At a position: flushes the write cache first, empties the read cache. kStatusDiskFull when nothing more could be
-    /// written.
+    /// Writes at a position: flushes the write cache first, empties the read cache. kStatusDiskFull when the system
+    /// takes no more bytes.
     std::int32_t Write(const void* buffer, long long position, long count);
-    /// At the mark: into the write cache when it has room, else straight to the file, and the mark advances.
+    /// Writes at the mark, which advances: into the write cache when it has room, else straight to the file.
     std::int32_t Write(const void* buffer, long count);
-    /// Writes the pending bytes at the mark, which advances; they stay pending when that fails.
+    /// Writes the pending bytes at the mark, which advances; on failure they stay pending.
     std::int32_t FlushWCache();
-    /// Commits the file to storage; what lies in the write cache is not part of that.
+    /// Commits the file to storage, without the bytes in the write cache.
     std::int32_t Flush();
 
-    /// The length in bytes, asked of the system each time; 0 on error. Bytes in the write cache do not count.
+    /// The length in bytes, read from the system each time; 0 on error. Bytes in the write cache do not count.
     long long GetEOF() const;
+    /// The same, with the status of reading it.
     std::int32_t GetEOF(long long* length) const;
-    /// The length that Open met, which costs nothing; a file that others write may have another by now.
+    /// The length in bytes when the file was opened, at no cost; others may have changed it since.
     long long LengthAtOpen() const { return stampAtOpen_.length; }
+    /// The state of the file when it was opened.
     const FileStamp& StampAtOpen() const { return stampAtOpen_; }
-    /// The state now, by one call of the system; of a memory file its length.
+    /// The state now, by one call of the system; for a memory file only the length means anything.
     std::int32_t GetStamp(FileStamp& stamp) const;
-    /// Cuts the file or extends it with zeros; a mark beyond `length` moves there.
+    /// Cuts the file or extends it with zeros; a mark beyond `length` moves to it.
     std::int32_t SetEOF(long long length);
-    /// SetEOF, with `preallocate` after asking for `length` bytes of space behind the end of the file, which may fail.
-    /// What is left of that beyond `length` is given back.
+    /// SetEOF; with `preallocate` first asks for `length` bytes of space past the end of the file, which may fail
+    /// without an error. Space beyond `length` is given back.
     std::int32_t Allocate(long long length, bool preallocate);
     /// Moves everything from `from` (at most the length) to the end of the file so that it begins at `to`; the length
     /// changes by the distance. kStatusNotOpen without write access.
     std::int32_t BlockMove(long long from, long long to);
-    /// The CRC-32 from the mark on, over as many bytes as the file is long; 0xFFFFFFFF when they are not there.
+    /// The CRC-32 from the mark on, over as many bytes as the file is long; 0xFFFFFFFF when fewer are there.
     std::uint32_t CRC();
 
+    /// The offset of the next read or write without a position.
     long long GetMark() const { return mark_; }
+    /// Moves the mark; any value is taken.
     void SetMark(long long mark) { mark_ = mark; }
 
-    /// The read cache, empty and of `size` bytes; in memory mode the content: `size` zeros.
+    /// Makes an empty read cache of `size` bytes; in memory mode, a content of `size` zeros.
     std::int32_t SetCache(long size);
-    /// The same with the caller's block, which stays shared; in memory mode it is the content.
+    /// Takes the caller's block, still shared, as read cache; in memory mode as content.
     std::int32_t SetCache(const std::shared_ptr<KTMem>& block);
+    /// Empties the read cache.
     void ResetCache();
-    /// Flushes first; when that fails its status is returned and nothing changes. 0 for no write cache.
+    /// Flushes, then makes a write cache of `size` bytes, none for 0. When flushing fails its status is returned and
+    /// nothing changes.
     std::int32_t SetWCache(int size);
-    /// The same with an array from `new char[]`, owned from then on, unless an error is returned.
+    /// The same with an array from `new char[]`, which the file owns from then on unless an error is returned.
     std::int32_t SetWCache(char* buffer, long size);
-    /// Pending bytes are lost.
+    /// Frees the write cache. Pending bytes are lost.
     void DeAllocWCache();
 
+    /// Whether there is an open file, or a content in memory mode.
     bool IsOpen() const { return descriptor_ >= 0 || (IsMemoryFile() && cache_ != nullptr); }
+    /// Whether the file was opened with kFileIOMemory.
     bool IsMemoryFile() const { return (mode_ & kFileIOMemory) != 0; }
+    /// Whether it was opened with kFileIOReadWrite.
     bool IsOpenForWriting() const { return IsOpen() && (mode_ & kFileIOReadWrite) != 0; }
+    /// The open modes, as given.
     unsigned int Mode() const { return mode_; }
+    /// The block of the read cache, or the content in memory mode; null for none.
     const std::shared_ptr<KTMem>& CacheBlock() const { return cache_; }
 
 private:

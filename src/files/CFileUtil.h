@@ -6,11 +6,11 @@
 
 #include <cstdint>
 
-/// Creates an empty file with the given POSIX permissions (less the process's mask); kStatusDuplicateName when
-/// something is there already. Type and creator codes are accepted and ignored: no file system here keeps them.
+/// Creates an empty file with the given POSIX permissions, less the process's mask. kStatusDuplicateName when
+/// something has the name. Type and creator codes are ignored: no file system here keeps them.
 KT_EXPORT std::int32_t CFileUtilCreate(const CFileRef& file, FourCC type, FourCC creator, std::uint32_t permissions);
-/// Removes a file; of a symbolic link the link. kStatusParameterError for a folder and a reference without a path.
+/// Removes a file, or a symbolic link itself. kStatusParameterError for a folder and a reference without a path.
 KT_EXPORT std::int32_t CFileUtilDelete(const CFileRef& file);
-/// The size in bytes of a file, that of its target for a symbolic link; a status, which is negative, when it cannot be
-/// had: kStatusParameterError for a folder.
+/// The size of a file in bytes, of a symbolic link's target; a negative status on failure: kStatusParameterError for
+/// a folder.
 KT_EXPORT long long CFileUtilFileSize(const CFileRef& file);

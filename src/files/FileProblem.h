@@ -8,39 +8,41 @@
 #include <string>
 #include <utility>
 
-/// With the facts that a sentence about it needs. Tests true when there is one.
+/// A problem, with the facts that a sentence about it needs.
 struct [[nodiscard]] FileProblem {
+    /// What went wrong.
     enum class Kind : std::uint8_t {
         none,
-        system,       // a call of the system failed
-        folder,       // the folder of the target cannot be opened
-        creation,     // no file can be made in that folder
-        noFreeName,   // every name that a temporary file may have there is taken
-        givenAway,    // the name of a temporary file leads to something else now; nothing was done
-        shortened,    // the original became shorter while it was copied
-        owner,        // cannot be kept
-        attribute,    // an extended one, `name`, cannot be kept
-        hardLinks,    // the file has `count` names, and the others would keep the old content
-        sameAsBackup, // `name` is the same file still, left so by an edit that was cut short, and would change with it
-        backups,      // there are too many
+        system,            // a call of the system failed
+        folder,            // the folder of the target cannot be opened
+        creation,          // no file can be made in that folder
+        noFreeName,        // every name that a temporary file may have there is taken
+        givenAway,         // the name of a temporary file leads to something else now; nothing was done
+        shortened,         // the original became shorter while it was copied
+        owner,             // cannot be kept
+        attribute,         // an extended attribute, `name`, cannot be kept
+        hardLinks,         // the file has `count` names, and the others would keep the old content
+        sameAsBackup,      // `name`, left by an edit that was cut short, is the same file and would change with it
+        backups,           // too many exist
         uncommittedBackup, // the backup cannot be committed to storage
-        changed,           // another program changed the file meanwhile, or put another in its place; nothing was done
-        refused,           // what was to be changed, or the look at what came of it, gave `status`
-        uncommitted        // it is done, but a loss of power now may undo it: the folder cannot be committed to storage
+        changed,           // another program changed or replaced the file meanwhile; nothing was done
+        refused,           // the change, or the judgement of its outcome, gave `status`
+        uncommitted        // done, but a loss of power may undo it: the folder cannot be committed to storage
     };
 
-    Kind kind = Kind::none;
-    int systemError = 0;     // errno, 0 when it was not the system
-    std::int32_t status = 0; // of `refused`
-    std::uint64_t count = 0;
-    std::string name = {};
+    Kind kind = Kind::none;  // none: all is well
+    int systemError = 0;     // errno; 0 when the system did not fail
+    std::int32_t status = 0; // of `refused`, else 0
+    std::uint64_t count = 0; // of `hardLinks`, else 0
+    std::string name = {};   // of `attribute` and `sameAsBackup`, else empty
 
-    /// Of a call that failed just now.
+    /// A problem of the call that just failed: takes errno.
     static FileProblem ofSystem(Kind kind = Kind::system, std::string name = {})
     {
         return {kind, errno, 0, 0, std::move(name)};
     }
 
+    /// Whether there is a problem.
     explicit operator bool() const { return kind != Kind::none; }
     /// As a status code (platform/core/Status.h), never 0 when there is a problem.
     KT_EXPORT std::int32_t Status() const;

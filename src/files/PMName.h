@@ -8,22 +8,26 @@
 #include <memory>
 #include <string_view>
 
-/// A name could not be allocated, or a stored length is negative.
+/// Thrown when memory for a name is short, or a stored length is negative.
 class KT_EXPORT PMNameException : public std::exception {
 public:
+    /// `reason` is a literal, which is not copied.
     explicit PMNameException(const char* reason) : reason_(reason) {}
     ~PMNameException() override;
+    /// The reason.
     const char* what() const noexcept override;
 
 private:
     const char* reason_; // a literal
 };
 
-/// Owns its text; null and empty are different values. Whatever allocates throws PMNameException when memory is short.
+/// A text that it owns; null and empty are different values. Whatever allocates throws PMNameException when memory is
+/// short.
 class KT_EXPORT PMName {
 public:
     PMName() = default;
     PMName(const char* text); // null for null
+    /// Copies the text up to its first NUL.
     explicit PMName(std::string_view text);
     PMName(const PMName& other);
     PMName(PMName&& other) noexcept = default;
@@ -32,19 +36,20 @@ public:
 
     /// NUL-terminated, owned by the name until it changes; null for a null name.
     const char* Get() const { return text_.get(); }
+    /// Get(); null for a null name.
     operator const char*() const { return Get(); }
 
-    /// Appends; nothing for null or empty text.
+    /// Appends a text; does nothing for a null or empty one.
     void Cat(const char* text);
     /// Appends the pieces between separators to `out`. One leading separator is skipped, and one at the end adds no
     /// empty piece; two in a row do.
     void GetElements(char separator, std::list<PMName>& out) const;
 
-    /// At the file's mark, through its write cache: a length of 2 bytes when `shortLength` is non-zero, else of 8, then
-    /// the characters. kStatusBadName, and nothing written, for a name that is too long for a 2-byte length.
+    /// Writes at the file's mark, through its write cache: a length of 2 bytes when `shortLength` is not 0, else of
+    /// 8, then the characters. kStatusBadName, and nothing written, for a name that is too long for a 2-byte length.
     std::int32_t ToFile(CFileIO& file, unsigned char shortLength) const;
-    /// From the file's mark. A stored length of 0 leaves the name as it is. Throws PMNameException for a negative one;
-    /// kStatusEndOfFile when it goes beyond the file. The name changes only on success.
+    /// Reads at the file's mark. A stored length of 0 leaves the name as it is. Throws PMNameException for a negative
+    /// length; kStatusEndOfFile when the length goes beyond the file. The name changes only on success.
     std::int32_t FromFile(CFileIO& file, unsigned char shortLength);
 
 private:

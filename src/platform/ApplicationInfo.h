@@ -1,4 +1,4 @@
-// Which application this process is, as documents name the one that saved them.
+// The name and version of this process's application, which documents keep of the one that saved them.
 #pragma once
 
 #include "platform/core/Export.h"
@@ -7,15 +7,16 @@
 
 namespace platform {
 
+/// An application, as people know it.
 struct ApplicationInfo {
-    std::string name;
-    std::string fullVersion;
+    std::string name;        // for people, UTF-8
+    std::string fullVersion; // such as "2.1.0"
 };
 
-/// What the host said; until then the name of the program's file, and the version "0".
+/// The application that the host named; until then the name of the program's file, and version "0".
 KT_EXPORT const ApplicationInfo& applicationInfo();
-/// Called by a host at start-up, once, ahead of any other thread: nothing in a program's file tells its name for
-/// people.
+/// Names the application. Call it once, at start-up, before any other thread runs. A program's file does not tell its
+/// name for people.
 KT_EXPORT void setApplicationInfo(ApplicationInfo info);
 
 } // namespace platform

@@ -9,20 +9,26 @@
 
 namespace platform {
 
+/// Owner, permissions and times of an open file.
 struct FileAttributes {
-    std::uint32_t owner = 0, group = 0;
+    std::uint32_t owner = 0,       // number of the user
+        group = 0;                 // number of the group
     std::uint32_t permissions = 0; // the low 12 mode bits
-    FileTime accessed, modified;
+    FileTime accessed,             // when the content was last read
+        modified;                  // when the content last changed
 };
 
 // On failure errno says why.
 
+/// Reads the attributes of an open file. False, with errno, on failure.
 KT_EXPORT bool fileAttributes(int descriptor, FileAttributes& attributes);
+/// Sets the low 12 mode bits. False, with errno, on failure.
 KT_EXPORT bool setPermissions(int descriptor, std::uint32_t permissions);
-/// Those of the last access and of the last modification; without `modified` the latter is now.
+/// Sets the times of the last access and the last modification, the latter to now without `modified`. False, with
+/// errno, on failure.
 KT_EXPORT bool setFileTimes(int descriptor, const FileTime& accessed, const FileTime* modified);
-/// Gives `to` the extended attributes of `from`; those that the system keeps for itself as far as they can be set. On
-/// failure `lost` is the name of one that cannot be kept, or empty.
+/// Gives `to` the extended attributes of `from`; those that only the system may set, as far as it allows. False, with
+/// errno, when one is lost: `lost` is its name, or empty when they cannot be read at all.
 KT_EXPORT bool copyExtendedAttributes(int from, int to, std::string& lost);
 
 } // namespace platform

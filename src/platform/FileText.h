@@ -1,4 +1,4 @@
-// Texts of files whose standard names no encoding, or one that few writers keep.
+// Texts of files whose standard names no encoding, or one that few writers keep to.
 #pragma once
 
 #include "platform/core/Export.h"
@@ -8,16 +8,18 @@
 
 namespace platform {
 
-/// What texts of a kind of file are in where they are not UTF-8: of AIFF the encoding of the machines that it comes
-/// from, of others Latin-1.
+/// The encoding of texts that are not UTF-8: of AIFF, that of the machines that the format comes from; of other kinds
+/// of file, Latin-1.
 enum class FallbackEncoding { latin1, macintosh };
 
+/// A text and the encoding that it was in.
 struct FileText {
-    std::string utf8;
+    std::string utf8; // the text, valid UTF-8
+    /// the IANA name of the file's encoding: "ISO-8859-1", "macintosh"; null for UTF-8
     const char* encoding = nullptr; ///< the IANA name of that which it was in: "ISO-8859-1", "macintosh"; null: UTF-8
 };
 
-/// UTF-8 where its bytes are that, else what its kind of file falls back to, in which each byte is a character.
+/// Takes the bytes for UTF-8 when they are valid, else for `fallback`, in which every byte is a character.
 KT_EXPORT FileText decodeFileText(std::string_view bytes, FallbackEncoding fallback);
 
 } // namespace platform

@@ -12,17 +12,17 @@ namespace platform {
 
 // Paths are absolute. On failure errno says why.
 
-/// The names in a folder, "." and ".." left out, sorted by their bytes; null when it cannot be read.
+/// The names in a folder without "." and "..", sorted by their bytes; null when it cannot be read.
 KT_EXPORT std::optional<std::vector<std::string>> namesInFolder(const std::string& path);
 
-/// Creates a folder and those above it, as far as they are missing. A symbolic link to a folder is one.
+/// Creates a folder and the missing ones above it; true also when it is there. A symbolic link to a folder counts as
+/// one.
 KT_EXPORT bool createFolders(const std::string& path);
 
-/// Removes an item with all that is in it, read-only folders too. No link is followed, and no other file system
-/// entered.
+/// Removes an item with everything in it, read-only folders too. Follows no link and enters no other file system.
 KT_EXPORT bool removeTree(const std::string& path);
 
-/// When the content of the item was last changed, links followed; null when it cannot be had.
+/// When the content of the item last changed, links followed; null when that cannot be read.
 KT_EXPORT std::optional<Date> modificationDate(const std::string& path);
 
 } // namespace platform

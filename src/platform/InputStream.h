@@ -10,6 +10,7 @@
 
 namespace platform {
 
+/// A source of bytes. Derived classes own or borrow what they read.
 class InputStream {
 public:
     InputStream() = default;
@@ -18,13 +19,14 @@ public:
     virtual ~InputStream() = default;
 
     /// Fills the front of `buffer` and returns how many bytes it put there: at least one, or 0 at the end of the
-    /// source. A negative number is a status code (core/Status.h), and the end as well.
+    /// source. A negative number is a status code (core/Status.h) and ends the source.
     virtual std::ptrdiff_t read(std::span<std::byte> buffer) = 0;
 };
 
-/// Bytes that lie in memory, and outlive the stream.
+/// A stream over bytes in memory, which must outlive it.
 class BorrowedInputStream : public InputStream {
 public:
+    /// Reads `bytes` from the front.
     explicit BorrowedInputStream(BytesView bytes) : left_(bytes) {}
 
     std::ptrdiff_t read(std::span<std::byte> buffer) override
@@ -39,9 +41,10 @@ private:
     BytesView left_;
 };
 
-/// Bytes that lie in memory, which the stream owns.
+/// A stream over bytes in memory, which it owns.
 class MemoryInputStream : public InputStream {
 public:
+    /// Reads `bytes` from the front.
     explicit MemoryInputStream(Bytes bytes) : bytes_(std::move(bytes)), stream_(bytes_) {}
     std::ptrdiff_t read(std::span<std::byte> buffer) override { return stream_.read(buffer); }
 

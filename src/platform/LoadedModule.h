@@ -1,11 +1,11 @@
-// Parts of the library that lie in files of their own beside it and are loaded when they are first needed, since they
-// bring other libraries with them.
+// Parts of the library in files of their own beside it. They bring other libraries with them, so each is loaded when
+// it is first needed.
 #pragma once
 
 namespace platform {
 
 /// The object that the module `ktfiles/FILE`, in the folder of the library or of the program that it is linked into,
-/// exports as `symbol`; null when there is none. Once loaded a module stays: what it made is anybody's.
+/// exports as `symbol`; null when there is none. A module stays loaded, since anybody may hold what it made.
 const void* loadModule(const char* file, const char* symbol);
 
 } // namespace platform

@@ -1,4 +1,4 @@
-// Lines for people who look for the cause of a failure; what the library returns never depends on them.
+// Lines for people who look for the cause of a failure; no result of the library depends on them.
 #pragma once
 
 #include "platform/core/Export.h"
@@ -7,12 +7,13 @@
 
 namespace platform {
 
-/// Takes one line without its end; called on whatever thread the failure happened.
+/// Takes one line without its end, on the thread on which the failure happened.
 using LogHandler = void (*)(const char* line);
 
-/// Replaces what becomes of lines and returns the handler in force before. Null silences the library; the first
-/// handler writes to standard error.
+/// Sets the handler of lines and returns the one before. Null silences the library; the first handler writes to
+/// standard error.
 KT_EXPORT LogHandler setLogHandler(LogHandler handler);
+/// Hands a line to the handler in force.
 KT_EXPORT void logLine(const std::string& line);
 
 } // namespace platform

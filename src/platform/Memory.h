@@ -7,8 +7,8 @@
 
 namespace platform {
 
-/// Bytes that the process could take now without the system having to write other memory to disk; the largest number
-/// where the system does not tell.
+/// How many bytes the process can take before the system has to write other memory to disk; the largest number where
+/// the system does not tell.
 KT_EXPORT std::uint64_t availableMemory();
 
 } // namespace platform

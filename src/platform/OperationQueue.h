@@ -1,7 +1,7 @@
-// Where work goes that must not keep its caller: a concurrent background queue, and queues of limited width over it.
+// Work that must not keep its caller: a concurrent background queue, and queues of limited width over it.
 //
-// Threads are borrowed, not owned: an idle one waits a second for more work and then ends, so that a process in which
-// nothing is locked or presented soon has no thread of ours.
+// Threads are borrowed, not owned: an idle thread waits a second for more work and ends, so that a process in which
+// nothing is locked or presented soon has no thread of the library.
 #pragma once
 
 #include "platform/core/Export.h"
@@ -11,18 +11,18 @@
 
 namespace platform {
 
-/// Runs `work` on a background thread of default priority, at once: no piece of work waits for another to end, since
-/// what runs here may block for as long as a lock is held. False when the system gives no thread; `work` is not run
-/// then.
+/// Runs `work` at once on a background thread of default priority. No piece of work waits for another to end, since
+/// work here may block for as long as a lock is held. False, and `work` not run, when the system gives no thread.
 KT_EXPORT bool runInBackground(std::function<void()> work);
 
-/// Operations in order of arrival, at most `maxConcurrentOperations` at a time. Copies are the same queue; operations
-/// that were added run although the last copy has gone.
+/// Operations in order of arrival, at most `maxConcurrentOperations` at a time. Copies are the same queue; added
+/// operations run even when the last copy is gone.
 class KT_EXPORT OperationQueue {
 public:
+    /// An empty queue; at least 1 operation at a time.
     explicit OperationQueue(int maxConcurrentOperations = 1);
 
-    /// False when no thread is to be had and none of the queue's is running, which would have taken it: not added then.
+    /// Appends an operation. False, and not added, when the system gives no thread and the queue has none running.
     bool add(std::function<void()> operation);
 
 private:

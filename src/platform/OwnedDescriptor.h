@@ -8,11 +8,13 @@
 
 namespace platform {
 
-/// Takes the descriptor; closed with its owner, through platform/SystemCalls.h.
+/// Owns a descriptor and closes it, through platform/SystemCalls.h.
 class KT_EXPORT OwnedDescriptor {
 public:
     OwnedDescriptor() = default;
+    /// Takes the descriptor over; -1 is none.
     explicit OwnedDescriptor(int number) : number_(number) {}
+    /// Takes the descriptor over and leaves none behind.
     OwnedDescriptor(OwnedDescriptor&& other) noexcept : number_(std::exchange(other.number_, -1)) {}
     OwnedDescriptor& operator=(OwnedDescriptor&& other) noexcept
     {
@@ -21,15 +23,17 @@ public:
     }
     ~OwnedDescriptor();
 
+    /// The descriptor, still owned here; -1 for none.
     int get() const { return number_; }
+    /// Whether there is a descriptor.
     explicit operator bool() const { return number_ >= 0; }
 
 private:
     int number_ = -1;
 };
 
-/// A path that leads to the open file itself in this process: what has its name meanwhile, or stands on the way to it,
-/// does not matter.
+/// A path that leads to the open file itself in this process, even when another file has its name or its folders have
+/// moved.
 KT_EXPORT std::string pathOfDescriptor(int descriptor);
 
 } // namespace platform

@@ -8,12 +8,13 @@
 
 namespace platform {
 
-/// The numbers of the signals that people and systems end processes with: SIGINT, SIGTERM, SIGHUP and their like.
+/// The signals by which people and systems end processes: SIGINT, SIGTERM, SIGHUP and their like.
 KT_EXPORT std::span<const int> endingSignals();
 
-/// Holds the ending signals back from the calling thread for as long as it lives; they come then.
+/// Holds the ending signals back from the calling thread for as long as it lives; pending ones arrive then.
 class KT_EXPORT SignalHold {
 public:
+    /// Blocks the signals.
     SignalHold();
     ~SignalHold();
     SignalHold(const SignalHold&) = delete;

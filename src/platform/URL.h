@@ -1,7 +1,7 @@
 // File URLs (RFC 8089, RFC 3986): immutable, shared, with the path styles of three systems.
 //
-// A URL keeps the decoded path and a directory flag; text is made of them when it is asked for, always in one canonical
-// form, so that two spellings of a location ("FILE://localhost/%41", "file:///A") make equal URLs.
+// A URL keeps the decoded path and a directory flag. Its text is made when asked for, always in one canonical form,
+// so that two spellings of a location ("FILE://localhost/%41", "file:///A") make equal URLs.
 #pragma once
 
 #include "platform/String.h"
@@ -13,13 +13,14 @@
 namespace platform {
 
 class URL;
-/// A retained URL object; null means none. Copies share the object.
+/// A shared URL object; null means none. Copies share the object.
 using URLRef = std::shared_ptr<const URL>;
 
+/// How a path is written.
 enum class PathStyle : int {
     posix = 0,   // /folder/file
     colon = 1,   // Volume:folder:file
-    windows = 2, // C:\folder\file
+    windows = 2, // `C:\folder\file`
 };
 
 /// An absolute or relative location. Whether it denotes a directory is part of its text: a trailing slash. Objects
@@ -40,9 +41,9 @@ public:
     /// volume, or for a name that is "." or "..".
     static URLRef createWithFileSystemPath(const String& path, PathStyle style, bool isDirectory,
                                            URLRef base = nullptr);
-    /// A file URL from an absolute path as the file system has it, in bytes that need not be UTF-8. Where they are not,
-    /// the URL has no path as a String, no component and no extension, and the text of it is not read back; but
-    /// posixPath() has it, and so can the file be opened. Null for one that is not absolute or holds a NUL.
+    /// A file URL from an absolute path as the file system has it, in bytes that need not be UTF-8. When they are
+    /// not, the URL has no path as a String, no component and no extension, and its text does not read back; but
+    /// posixPath() has the path, and the file can be opened. Null for a path that is not absolute or holds a NUL.
     static URLRef createWithFileSystemBytes(std::string_view path, bool isDirectory);
     /// From a URL's text, in which characters beyond ASCII may stand unescaped. Without a scheme it is relative to
     /// `base`, and without a base too a path. Query and fragment stay in the text and are no part of the path.
@@ -59,12 +60,14 @@ public:
     std::string string() const;
     /// The text with the base applied.
     std::string absoluteString() const;
+    /// The URL that this one is relative to; null when it is absolute.
     URLRef baseURL() const;
 
     /// False for other schemes, and for a relative URL whose base does not make it one.
     bool isFileURL() const;
     /// Names a file by its file-system id ("file:///.file/id=…") rather than by path.
     bool isFileReferenceURL() const;
+    /// Whether the URL denotes a directory: its text ends with a slash.
     bool hasDirectoryPath() const { return isDirectory_; }
     /// Whether the path, without its base, is absolute.
     bool hasAbsolutePath() const;
@@ -73,8 +76,8 @@ public:
     /// null when there is none: a URL of another scheme, a POSIX or colon path on another host, a colon path outside
     /// "/Volumes", or a path that the style would read back as another one (a name with "\" in Windows style).
     String copyFileSystemPath(PathStyle style) const;
-    /// What copyFileSystemPath gives in POSIX style, without a NUL and without a copy; empty where there is no path on
-    /// this system. Valid UTF-8, unless it was made of other bytes. It lives as long as the URL.
+    /// What copyFileSystemPath gives in POSIX style, without a copy and without a NUL; empty where there is no such
+    /// path. Valid UTF-8, unless the URL was made from other bytes. It lives as long as the URL.
     const std::string& posixPath() const;
     /// The last component of the path, decoded; "/" for the root; null for a URL of another scheme.
     String copyLastPathComponent() const;
@@ -100,6 +103,7 @@ private:
     };
 
 public:
+    /// For the factories; use those.
     URL(Creation, std::string path, bool isDirectory, std::unique_ptr<const Rest> rest);
 
 private:

@@ -9,14 +9,17 @@
 
 namespace platform {
 
+/// The space of a volume, in bytes.
 struct VolumeSpace {
-    std::int64_t free = 0; // bytes that the process may use
-    std::int64_t total = 0;
+    std::int64_t free = 0;  // bytes that the process may use
+    std::int64_t total = 0; // bytes in all
 };
 
-/// Of the volume that the item at a path lies on; null, with errno, when it cannot be had.
+/// Whether the volume of the item at a path is read-only; null, with errno, on failure.
 KT_EXPORT std::optional<bool> volumeIsReadOnly(const char* path);
+/// Whether its files are on this machine; null, with errno, on failure.
 KT_EXPORT std::optional<bool> volumeIsLocal(const char* path);
+/// The space of the volume of the item at a path; null, with errno, on failure.
 KT_EXPORT std::optional<VolumeSpace> volumeSpace(const char* path);
 
 /// Whether a file system of this name ("nfs4", "cifs", "fuse.sshfs") keeps its files on another machine.

@@ -1,4 +1,4 @@
-// A parsed XML tree, for who would rather look around in a document than listen to it.
+// A parsed XML tree, for clients that look around in a document instead of hearing its events.
 #pragma once
 
 #include "platform/XMLParser.h"
@@ -11,19 +11,20 @@
 
 namespace platform {
 
-/// An element of a tree that somebody else owns; valid as long as the tree. Names are as they are written, with their
+/// An element of a tree that somebody else owns; valid as long as the tree. Names are as written, with their
 /// prefixes.
 class KT_EXPORT XMLNode {
 public:
     /// An element node of the parser library (libxml2's `xmlNodePtr`), of a tree that the caller holds.
     static XMLNode fromLibraryNode(void* node) { return XMLNode(node); }
 
+    /// The name of the element.
     std::string name() const;
-    /// Null when there is no such attribute.
+    /// The value of an attribute; null when there is no such attribute.
     std::optional<std::string> attribute(std::string_view name) const;
     /// The child elements of that name, in document order.
     std::vector<XMLNode> elementsForName(std::string_view name) const;
-    /// All text within, that of inner elements included.
+    /// All text within, including that of inner elements.
     std::string stringValue() const;
 
 private:
@@ -40,6 +41,7 @@ public:
     XMLTree(const XMLTree&) = delete;
     XMLTree& operator=(const XMLTree&) = delete;
 
+    /// The outermost element.
     XMLNode root() const;
 
 private:

@@ -1,22 +1,24 @@
-// Where a project's media and working folders lie, whatever kind of project it is, and which package a location is in.
+// Where the media and working folders of a project lie, whatever kind of project it is, and which package contains a
+// location.
 #pragma once
 
 #include "files/CFileRef.h"
 
-/// By the extension, without regard to case.
+/// The kind of a project by its extension, without regard to case.
 enum ProjectDirectoryType : int {
     kProjectDirectoryPackage = 0,        // "fuguex"
-    kProjectDirectoryPlain = 1,          // any other
+    kProjectDirectoryPlain = 1,          // any other extension
     kProjectDirectoryOldBand = 2,        // "band", a package without "Alternatives"
-    kProjectDirectoryBand = 3,           // "band" with them, or one that does not exist yet
+    kProjectDirectoryBand = 3,           // "band" with them, or one that does not exist
     kProjectDirectoryMwand = 4,          // "mwand"
     kProjectDirectoryGrid = 5,           // "grid"
     kProjectDirectoryConcertProject = 6, // "concert" with an entry "isProject"
-    kProjectDirectoryConcert = 7,        // "concert" without
+    kProjectDirectoryConcert = 7,        // "concert" without that entry
 };
 
+/// Where a project keeps its media.
 enum fugueXProjectType_t : int {
-    kProjectTypeFromProject = 0,   // what the project says of itself
+    kProjectTypeFromProject = 0,   // as the project itself says
     kProjectTypeMediaInside = 1,   // media inside the package
     kProjectTypeProjectFolder = 2, // media beside the package, in the folder that contains it
 };
@@ -42,21 +44,22 @@ enum TTypeDir_Prj : int {
     kDirPrjQuickSampler = 19,
 };
 
+/// The kind of the project at a location; asks the file system only for "band" and "concert".
 KT_EXPORT ProjectDirectoryType GetProjectDirectoryType(const CFileRef& project);
 
-/// The folder of the project `base`, created with `create`, the base too when it is missing. `alternativeIndex` matters
-/// for folders inside an alternative. Invalid for a kind of project that has no such folder, for numbers outside the
-/// tables, and when a folder cannot be created.
+/// The folder of the project `base`; `create` makes it and the base where they are missing. `alternativeIndex`
+/// matters only for folders inside an alternative. Invalid for a kind of project without such a folder, for numbers
+/// outside the tables, and when a folder cannot be created.
 KT_EXPORT CFileRef GetProjectDirectoryRefForBase(const CFileRef& base, TTypeDir_Prj type, bool create,
                                                  fugueXProjectType_t layout, long alternativeIndex);
 
-/// The layout that a project keeps to: what `GetProjectDirectoryRefForBase` finds for kProjectTypeFromProject.
+/// The layout that a project keeps to, which kProjectTypeFromProject stands for.
 KT_EXPORT fugueXProjectType_t GetProjectLayout(const CFileRef& base);
 
-/// The nearest package around a location, or the location itself when it is one: a folder with the extension of one of
-/// the suite's packages. By the text of the path, links not resolved; null when there is none.
+/// The location itself if it is a package, else the nearest package around it: a folder with the extension of one of
+/// the suite's packages. Judged by the text of the path, links not resolved; null when there is none.
 KT_EXPORT platform::URLRef GetProjectBundleURL(const platform::URLRef& location);
 /// The same for a reference; invalid when there is none.
 KT_EXPORT CFileRef CFileUtilEnclosingProjectBundle(const CFileRef& item);
-/// Whether the item, there or not, lies in a package. A package does not lie in itself.
+/// Whether the item, which need not exist, lies in a package. A package does not lie in itself.
 KT_EXPORT bool CFileUtilIsInDocumentBundle(const CFileRef& item);

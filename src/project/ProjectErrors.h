@@ -1,4 +1,4 @@
-// Errors of the project layer: of the system, and its own.
+// Errors of the project layer: those of the system, and its own.
 #pragma once
 
 #include "platform/core/Error.h"
@@ -7,7 +7,7 @@
 #include <cstring>
 #include <string>
 
-/// Fills `error` from errno; always false.
+/// Fills `error` from errno, with `what` ahead of the text unless it is empty; always false.
 inline bool failWithSystemError(platform::Error* error, const std::string& what = "")
 {
     const int number = errno;

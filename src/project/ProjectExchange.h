@@ -1,24 +1,27 @@
-// Exchanges an alternative's project data with a backup's, name by name, so that it can be completed or undone from
-// wherever it was cut short. docs/formats/project-package.md tells the steps.
+// Exchanges an alternative's project data with a backup's, name by name, so that an interrupted exchange can be
+// completed or undone. docs/formats/project-package.md lists the steps.
 #pragma once
 
 #include "platform/core/Error.h"
 #include "project/ExchangeRecord.h"
 
+/// One exchange between two folders.
 class ProjectExchange {
 public:
-    /// Absolute paths of two folders on one file system.
+    /// Takes absolute paths of two folders on one file system.
     ProjectExchange(std::string alternativeFolder, std::string backupFolder);
 
-    /// The whole exchange. False with `error`: nothing has changed, or the record is still there and the text says so.
+    /// Runs the whole exchange. False with `error`: nothing has changed, or the record is still there and the text
+    /// says so.
     bool run(const std::string& backupInRecord, platform::Error* error);
 
-    /// Brings what a record tells of to its end, or back, and forgets it. False with `error` when it cannot; when items
-    /// are not what they were, nothing is moved, and the record is forgotten.
+    /// Completes the exchange of a record, and removes the record. False with `error` when that fails; when items are
+    /// not what the record says, nothing is moved, and the record is removed.
     bool complete(const ExchangeRecord& record, platform::Error* error) { return settle(record, Side::there, error); }
+    /// Undoes the exchange of a record, and removes the record. Fails as complete() does.
     bool undo(const ExchangeRecord& record, platform::Error* error) { return settle(record, Side::back, error); }
 
-    /// Whether every item is where the exchange wanted it.
+    /// Whether every item is where the exchange wants it.
     bool isComplete(const ExchangeRecord& record) const;
 
 private:

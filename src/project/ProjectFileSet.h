@@ -1,4 +1,4 @@
-// A set of absolute paths, as large as a project's media are: the texts lie side by side, and an entry costs no
+// A set of absolute paths, sized for the media of a project: the texts lie side by side, and an entry needs no
 // allocation of its own.
 #pragma once
 
@@ -13,20 +13,22 @@
 #include <string_view>
 #include <vector>
 
-/// Iterates in the order of insertion. Views are valid, and end in a NUL, as long as the set lives; moving it moves no
-/// text.
+/// A set of paths in the order of insertion. Views are valid, and end in a NUL, as long as the set lives; moving it
+/// moves no text.
 class KT_EXPORT ProjectFileSet {
 public:
     ProjectFileSet() = default;
+    /// Inserts the paths in order.
     ProjectFileSet(std::initializer_list<std::string_view> paths);
     ProjectFileSet(ProjectFileSet&&) = default;
     ProjectFileSet& operator=(ProjectFileSet&&) = default;
 
-    /// False when the path is there already.
+    /// Copies a path into the set; false when it is there already.
     bool insert(std::string_view path);
-    /// Each in its turn, what the table has of all of them being asked of memory first: a large set waits for it else
-    /// with every path.
+    /// Inserts the paths in order. Fetches the table's memory for all of them ahead, since a large set would
+    /// otherwise wait for it with every path.
     void insert(std::span<const std::string> paths);
+    /// Whether the path is there, compared by its bytes.
     bool contains(std::string_view path) const;
     std::size_t size() const { return paths_.size(); }
     bool empty() const { return paths_.empty(); }

@@ -1,6 +1,6 @@
-// ProjectInformation reads what a project package says about itself without opening the project: its alternatives, the
-// metadata and the media of each, and its backups. It knows the package's layout and writes the information dictionary
-// back. docs/formats/project-package.md has the format.
+// ProjectInformation reads what a project package says about itself without opening the project: its alternatives,
+// the metadata and media of each, and its backups. It knows the layout of a package and writes the information
+// dictionary. docs/formats/project-package.md has the format.
 #pragma once
 
 #include "platform/PropertyList.h"
@@ -16,80 +16,110 @@
 #include <string>
 #include <vector>
 
-/// The domain of errors that are the project layer's own; the text says what is wrong.
+/// The domain of errors of the project layer itself; the text says what is wrong.
 inline constexpr const char* kProjectErrorDomain = "KTFiles";
 
+/// Whether missing folders are created.
 enum class CreateDirectories : bool { no, yes };
+/// Whether a path is wanted even when nothing is there.
 enum class AcceptMissing : bool { no, yes };
+/// Whether the oldest backups make room.
 enum class PurgeOldBackups : bool { no, yes };
 
+/// One backup of an alternative.
 struct ProjectBackup {
-    platform::URLRef url; // the backup's folder
-    platform::Date date;  // when its project data was changed
+    platform::URLRef url; // its folder
+    platform::Date date;  // when its project data last changed
 };
 
-/// Which backup an exchange of data that was cut short had to do with.
+/// An exchange of data that was interrupted.
 struct InterruptedProjectExchange {
-    platform::URLRef backupURL; // null when the record of the exchange cannot be understood
-    bool isComplete = false;    // nothing is left to do but to forget it
+    platform::URLRef backupURL; // null when its record cannot be understood
+    bool isComplete = false;    // only its record is left to be removed
 };
 
-/// What is to become of an exchange that was cut short: brought to its end, or back; or left as it stands, all data
-/// where it is, and its record dropped.
+/// What becomes of an interrupted exchange: it is completed, or undone, or its record is dropped with all data left
+/// where it is.
 enum class SettleExchange { complete, undo, forget };
 
-/// Owns the dictionaries that it has read; whoever changes a package makes a new object. URLs are taken by reference
-/// and may be null, which gives null. Nothing is believed of a property list: a value of another shape than its key's
-/// reads as absent. Used by one thread at a time.
+/// One project package, read. Owns the dictionaries that it has read; after a change to the package, make a new
+/// object. URLs may be null, which gives null. A value in a property list whose shape does not fit its key reads as
+/// absent. One thread at a time.
 class KT_EXPORT ProjectInformation {
 public:
     /// `initWithProjectURL:`; null when the package's information dictionary cannot be read.
     static std::unique_ptr<ProjectInformation> initWithProjectURL(const platform::URLRef& projectURL);
 
+    /// The package, as it was given.
     const platform::URLRef& projectURL() const { return projectURL_; }
-    /// As read, with both forms of the names.
+    /// The information dictionary, with both forms of the names.
     const platform::Dictionary& projectInfo() const { return projectInfo_; }
 
-    /// Index in decimal -> name; empty without names.
+    /// The names of the alternatives by index in decimal; empty without names.
     platform::Dictionary alternativeNames() const;
-    /// The keys of the names: by number, then what is no number, by its bytes.
+    /// The keys of the names: numbers in order, then the others by their bytes.
     std::vector<std::string> variationIndexesSorted() const;
+    /// The name of an alternative; null for none.
     std::optional<std::string> variationNameForIndex(long index) const;
+    /// The index of the alternative that was open last; 0 when the package does not say.
     long lastActiveVariation() const;
+    /// Whether the media lie in a folder beside the package.
     bool hasProjectFolder() const;
 
-    /// The alternative's metadata, null when there is none; kept from the first success on. The pointer lives as long
-    /// as this object.
+    /// The metadata of an alternative; null when there is none. Kept from the first success on; the pointer lives as
+    /// long as this object.
     const platform::Dictionary* loadMetaDataForVariant(long index);
 
-    // Of one alternative's metadata; 0, false or null when absent. A negative index means `lastActiveVariation`.
+    // One alternative's metadata; 0, false or null when absent. A negative index means lastActiveVariation().
+    /// In Hz.
     std::uint64_t sampleRate(long index);
+    /// The tempo at the start.
     double beatsPerMinute(long index);
+    /// A row of the application's table of frame rates.
     std::int64_t frameRateIndex(long index);
+    /// Whether positions count time rather than bars.
     bool isTimeCodeBased(long index);
+    /// Whether the alternative has a grid of cells.
     bool hasGrid(long index);
+    /// A row of the application's table of surround formats.
     std::int64_t surroundFormatIndex(long index);
+    /// A row of the application's table of surround modes.
     std::int64_t surroundModeIndex(long index);
+    /// The key, a number of the application.
     std::int64_t signKey(long index);
+    /// Beats in a bar.
     std::int64_t timeSignatureNumerator(long index);
+    /// The note that is one beat: 4, 8.
     std::int64_t timeSignatureDenominator(long index);
+    /// How many tracks there are.
     std::int64_t numberOfTracks(long index);
+    /// The key's note ("F#"), the same in every language; null when absent.
     std::optional<std::string> songKeyAsNonLocalizedString(long index);
+    /// The key's mode ("minor"), the same in every language; null when absent.
     std::optional<std::string> songGenderAsNonLocalizedString(long index);
+    /// The version of the metadata's layout.
     std::int64_t metaDataVersionOfVariant(long index);
-    /// The largest of all alternatives; 0 without any.
+    /// The greatest of all alternatives; 0 without any.
     std::int64_t maxMetaDataVersionOfAnyVariant();
 
-    // The media that alternatives use: paths as they are stored, and made absolute. Elements of a list that are no
+    // The media of alternatives: paths as stored, and made absolute. Elements of a list that are no texts, and paths
+    // that can name no file, are left out.
     // texts, and paths that can name no file, are left out.
+    /// The paths as stored, in their order.
     std::vector<std::string> relativeFilepathsUsedByVariantIndex(ProjectMediaKind kind, long index);
+    /// The absolute paths of one kind.
     ProjectFileSet filesUsedByVariantIndex(ProjectMediaKind kind, long index);
+    /// The absolute paths of one kind, of all alternatives.
     ProjectFileSet filesUsedByAnyVariant(ProjectMediaKind kind);
+    /// The absolute paths of all kinds.
     ProjectFileSet allUsedFilesByVariantIndex(long index);
+    /// The absolute paths of all kinds, of all alternatives.
     ProjectFileSet allUsedFilesByAnyVariant();
 
     // The same by kind.
+    /// The kinds of media.
     using Kind = ProjectMediaKind;
+    /// Each the files, or the paths as stored, of the kind that it names.
     ProjectFileSet audioFilesUsedByVariantIndex(long i) { return filesUsedByVariantIndex(Kind::audio, i); }
     ProjectFileSet audioFilesUsedByAnyVariant() { return filesUsedByAnyVariant(Kind::audio); }
     ProjectFileSet impulseResponsesFilesUsedByVariantIndex(long i)
@@ -140,46 +170,56 @@ public:
         return relativeFilepathsUsedByVariantIndex(Kind::alchemy2, i);
     }
 
-    /// `pathForVariant:acceptMissing:`, of this project.
+    /// `pathForVariant:acceptMissing:`: the folder of an alternative of this project; null when it is missing, unless
+    /// that is accepted.
     std::optional<std::string> pathForVariant(long index, AcceptMissing acceptMissing) const;
+    /// The same as a URL.
     platform::URLRef URLForVariant(long index, AcceptMissing acceptMissing) const;
 
-    // Names. The display name is that of the desktop, without the extension of a package.
+    // Names. The display name is the desktop's, without the extension of a package.
+    /// The display name of a package; null without a location.
     static std::optional<std::string> projectDisplayNameWithoutExtension(const platform::URLRef& location);
-    /// `convertNamesToTokenBased:forProjectAtURL:`: every occurrence of the display name becomes "{PROJECT_NAME}".
+    /// `convertNamesToTokenBased:forProjectAtURL:`: replaces every occurrence of the display name with
+    /// "{PROJECT_NAME}".
     static platform::Dictionary convertNamesToTokenBased(const platform::Dictionary& names,
                                                          const platform::URLRef& projectURL);
+    /// `convertNamesFromTokenBased:forProjectAtURL:`: replaces every "{PROJECT_NAME}" with the display name.
     static platform::Dictionary convertNamesFromTokenBased(const platform::Dictionary& names,
                                                            const platform::URLRef& projectURL);
 
     // The information dictionary.
-    /// As it is in the file; null for what is no property list of a dictionary.
+    /// The dictionary as it is in the file; null when the file is no property list of a dictionary.
     static std::optional<platform::Dictionary>
     infoDictionaryWithContentsOfURL(const platform::URLRef& url,
                                     platform::PropertyListReading reading = platform::PropertyListReading::strict);
-    /// Of a package, with both forms of the names; a package that got a new name shows names that follow it.
+    /// The dictionary of a package, with both forms of the names; the names follow a package that was renamed.
     static std::optional<platform::Dictionary>
     infoDictionaryFromProjectBundleURL(const platform::URLRef& bundleURL,
                                        platform::PropertyListReading reading = platform::PropertyListReading::strict);
-    /// Stamps the version of the layout and the application that saves.
+    /// Sets the version of the layout and the application that saves.
     static void addVersionAndAppInfoToInfoDictionary(platform::Dictionary& info);
-    /// What `writeInfoDictionaryToProjectBundleURL` writes: a copy, stamped, with the names in token form.
+    /// A copy as `writeInfoDictionaryToProjectBundleURL` writes it, with version, application, and names in token
+    /// form.
     static platform::Dictionary infoDictionaryForProjectBundleURL(const platform::Dictionary& info,
                                                                   const platform::URLRef& bundleURL);
-    /// `writeInfoDictionary:toURL:error:`: as it is, as a binary property list, into the file itself.
+    /// `writeInfoDictionary:toURL:error:`: writes the dictionary as it is, as a binary property list, into the file
+    /// itself. False with `error`.
     static bool writeInfoDictionaryToURL(const platform::Dictionary& info, const platform::URLRef& url,
                                          platform::Error* error = nullptr);
-    /// `writeInfoDictionary:toProjectBundleURL:error:`; creates "Resources".
+    /// `writeInfoDictionary:toProjectBundleURL:error:`; creates "Resources". False with `error`.
     static bool writeInfoDictionaryToProjectBundleURL(const platform::Dictionary& info,
                                                       const platform::URLRef& bundleURL,
                                                       platform::Error* error = nullptr);
 
-    // Where things lie in a package. With CreateDirectories::yes the folders around a file are created, of a folder
-    // itself too; null when that fails, and for an index outside 0 to 4294967295.
-    /// The alternative's folder, of the newest of three generations that exists.
+    // Where things lie in a package. CreateDirectories::yes creates the folders around a file, and a folder itself
+    // too. Null when that fails, and for an index outside 0 to 4294967295.
+    /// The alternative's folder in the newest existing of three generations; null when it is missing, unless that is
+    /// accepted.
     static std::optional<std::string> pathForVariant(long index, const platform::URLRef& baseURL,
                                                      AcceptMissing acceptMissing);
+    /// The same as a URL.
     static platform::URLRef URLForVariant(long index, const platform::URLRef& baseURL, AcceptMissing acceptMissing);
+    /// Each the location that it names, in the package or in the folder of one alternative.
     static platform::URLRef alternativesBaseURLForBundleURL(const platform::URLRef& bundleURL,
                                                             CreateDirectories create);
     static platform::URLRef projectInformationURLForBundleURL(const platform::URLRef& bundleURL,
@@ -203,40 +243,39 @@ public:
                                                     CreateDirectories create);
     static platform::URLRef backupsBaseURLForBundleURL(const platform::URLRef& bundleURL, long variantIndex,
                                                        CreateDirectories create);
-    /// Of the alternative's project data; null when there is none.
+    /// When the alternative's project data last changed; null when it has none.
     static std::optional<platform::Date> modificationDateForVariantIndex(long variantIndex,
                                                                          const platform::URLRef& bundleURL);
 
     // Backups of an alternative.
-    /// Those that hold project data, by date, then by name; hidden folders are none.
+    /// The backups with project data, by date, then by name; hidden folders do not count.
     static std::vector<ProjectBackup> backupsForBundleURL(const platform::URLRef& bundleURL, long variantIndex);
-    /// Where the next backup goes: a name of two digits, below `maxBackups`, that nothing has. With
-    /// PurgeOldBackups::yes the oldest backups are deleted first, as many as are too many; when there is no name
-    /// nothing is. Null when there is no room, and for a folder of backups that lies behind a link in the package.
+    /// The folder of the next backup: a free name of two digits below `maxBackups`. PurgeOldBackups::yes first
+    /// deletes the oldest backups beyond the limit; without a free name it deletes nothing. Null when there is no
+    /// room, and for a folder of backups behind a link in the package.
     static platform::URLRef urlForNewBackupForBundleURL(const platform::URLRef& bundleURL, long variantIndex,
                                                         CreateDirectories create, int maxBackups,
                                                         PurgeOldBackups purgeOldBackups);
-    /// Deletes the oldest backups until `maxBackups` are left, `kept` among them. Of the others the folder that was
-    /// changed last goes last. False, with errno, when one cannot be deleted.
+    /// Deletes the oldest backups until `maxBackups` are left, `kept` among them; the folder that changed last goes
+    /// last. False, with errno, when one cannot be deleted.
     static bool purgeBackupsForBundleURL(const platform::URLRef& bundleURL, long variantIndex, int maxBackups,
                                          const platform::URLRef& kept = nullptr);
-    /// The alternative's project data changes places with the backup's, each with its metadata, ARA data and autosave;
-    /// the same call once more undoes it. Nothing is copied, and nothing ever replaces anything: cut short at any
-    /// point, every item is at one of the two places, and a record in the alternative's folder says what was going on.
-    /// False with `error` means that nothing has changed or, where even that could not be had (the text says so), that
-    /// the record is still there.
+    /// Exchanges the alternative's project data with the backup's, each with its metadata, ARA data and autosave; the
+    /// same call again undoes it. Nothing is copied and nothing is replaced: after an interruption at any point,
+    /// every item is at one of the two places, and a record in the alternative's folder says what was going on. False
+    /// with `error`: nothing has changed or, where undoing failed too (the text says so), the record is still there.
     ///
-    /// The next call settles what it finds recorded, and says so in the log: an exchange with the same backup is
-    /// completed, and is what the call was asked for; one with another backup is undone first, unless it had come to
-    /// its end. What others have replaced meanwhile stays where it is, and the call fails. So it does for a backup that
-    /// is a link, or lies behind one in the package.
+    /// The next call settles a recorded exchange, and logs it. One with the same backup is completed, and that is all
+    /// the call does; one with another backup is undone first, unless it is complete. Items that others have replaced
+    /// stay where they are, and the call fails. It also fails for a backup that is a link, or lies behind one in the
+    /// package.
     static bool exchangeDataOfProjectAtURL(const platform::URLRef& bundleURL, long variantIndex,
                                            const platform::URLRef& backupURL, platform::Error* error = nullptr);
-    /// What an exchange that was cut short has left to be settled; null when there is none.
+    /// The interrupted exchange of an alternative; null when there is none.
     static std::optional<InterruptedProjectExchange> interruptedExchangeForBundleURL(const platform::URLRef& bundleURL,
                                                                                      long variantIndex);
-    /// Settles it without another exchange. A record that names a backup by its path is followed only when `backupURL`
-    /// leads there too; else that may be null. One that cannot be understood can only be forgotten.
+    /// Settles it without another exchange. A record that names a backup by its path counts only when `backupURL`
+    /// leads there too; for others that may be null. A record that cannot be understood can only be forgotten.
     static bool settleInterruptedExchangeForBundleURL(const platform::URLRef& bundleURL, long variantIndex,
                                                       SettleExchange how, const platform::URLRef& backupURL = nullptr,
                                                       platform::Error* error = nullptr);

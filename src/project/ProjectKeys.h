@@ -6,7 +6,7 @@
 #include <array>
 #include <string_view>
 
-/// Of the information dictionary, "Resources/ProjectInformation.plist".
+/// Keys of the information dictionary, "Resources/ProjectInformation.plist".
 namespace ProjectInfoKey {
 inline constexpr const char* bundleVersion = "BundleVersion";       // number
 inline constexpr const char* variantNames = "VariantNames";         // dictionary: index in decimal -> name
@@ -16,7 +16,7 @@ inline constexpr const char* hasProjectFolder = "HasProjectFolder"; // boolean
 inline constexpr const char* lastSavedFrom = "LastSavedFrom";       // text
 } // namespace ProjectInfoKey
 
-/// Of an alternative's metadata, "MetaData.plist".
+/// Keys of an alternative's metadata, "MetaData.plist".
 namespace ProjectMetaDataKey {
 inline constexpr const char* sampleRate = "SampleRate";                             // unsigned integer
 inline constexpr const char* beatsPerMinute = "BeatsPerMinute";                     // number
@@ -32,16 +32,17 @@ inline constexpr const char* numberOfTracks = "NumberOfTracks";                 
 inline constexpr const char* songKey = "SongKey";                                   // text
 inline constexpr const char* songGenderKey = "SongGenderKey";                       // text
 inline constexpr const char* version = "Version";                                   // integer
-inline constexpr const char* audioFiles = "AudioFiles";                             // arrays of paths from here on
-inline constexpr const char* impulseResponsesFiles = "ImpulsResponsesFiles";        // Kept: the spelling
-inline constexpr const char* samplerInstrumentsFiles = "SamplerInstrumentsFiles";
-inline constexpr const char* playbackFiles = "PlaybackFiles";
-inline constexpr const char* gestiniopFiles = "GestiniopFiles";
-inline constexpr const char* quicksamplerFiles = "QuicksamplerFiles";
-inline constexpr const char* videoFiles = "VideoFiles";
-inline constexpr const char* alchemyFiles = "AlchemyFiles";
+inline constexpr const char* audioFiles = "AudioFiles";                           // arrays of paths, this and the next
+inline constexpr const char* impulseResponsesFiles = "ImpulsResponsesFiles";      // Kept: the spelling
+inline constexpr const char* samplerInstrumentsFiles = "SamplerInstrumentsFiles"; // as above
+inline constexpr const char* playbackFiles = "PlaybackFiles";                     // as above
+inline constexpr const char* gestiniopFiles = "GestiniopFiles";                   // as above
+inline constexpr const char* quicksamplerFiles = "QuicksamplerFiles";             // as above
+inline constexpr const char* videoFiles = "VideoFiles";                           // as above
+inline constexpr const char* alchemyFiles = "AlchemyFiles";                       // as above
 } // namespace ProjectMetaDataKey
 
+/// The kinds of media that an alternative lists.
 enum class ProjectMediaKind {
     audio,
     impulseResponses,
@@ -53,13 +54,14 @@ enum class ProjectMediaKind {
     alchemy2,
 };
 
+/// A row of kProjectMediaLists.
 struct ProjectMediaList {
-    ProjectMediaKind kind;
-    const char* key;
-    const char* name; // for people
+    ProjectMediaKind kind; // also its row
+    const char* key;       // in the metadata
+    const char* name;      // for people
 };
 
-/// In the order of the kinds.
+/// The lists in the order of the kinds.
 inline constexpr std::array<ProjectMediaList, 8> kProjectMediaLists{{
     {ProjectMediaKind::audio, ProjectMetaDataKey::audioFiles, "audio"},
     {ProjectMediaKind::impulseResponses, ProjectMetaDataKey::impulseResponsesFiles, "impulse responses"},

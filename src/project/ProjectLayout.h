@@ -6,35 +6,37 @@
 
 #include <array>
 
+/// Names of folders and files in a package.
 namespace ProjectLayout {
-inline constexpr const char* resources = "Resources";
-inline constexpr const char* projectInformation = "ProjectInformation.plist";
-inline constexpr const char* media = "Media";
-/// Three generations of the folder that holds the alternatives, newest first.
+inline constexpr const char* resources = "Resources";                         // folder of the package
+inline constexpr const char* projectInformation = "ProjectInformation.plist"; // in it: the information dictionary
+inline constexpr const char* media = "Media";                                 // folder of media in the package
+/// The three generations of the folder of alternatives, newest first.
 inline constexpr std::array<const char*, 3> alternatives{"Alternatives", "Variations", "Variants"};
 // In an alternative's folder.
-inline constexpr const char* metaData = "MetaData.plist";
-inline constexpr const char* metaDataCopy = "MetaData.bak";
-inline constexpr const char* windowImage = "WindowImage.jpg";
-inline constexpr const char* oldDisplayState = "DisplayState.plist";
-inline constexpr const char* displayStateArchive = "DisplayStateArchive";
-inline constexpr const char* displayStateMobile = "DisplayStateMobile.plist";
-inline constexpr const char* projectData = "ProjectData";
-inline constexpr const char* araFiles = "ARA Files";
-inline constexpr const char* autosave = "Autosave";
-inline constexpr const char* backups = "Project File Backups";
+inline constexpr const char* metaData = "MetaData.plist";            // what ProjectInformation reads of the alternative
+inline constexpr const char* metaDataCopy = "MetaData.bak";          // the copy before
+inline constexpr const char* windowImage = "WindowImage.jpg";        // a picture of the window
+inline constexpr const char* oldDisplayState = "DisplayState.plist"; // of older versions
+inline constexpr const char* displayStateArchive = "DisplayStateArchive";     // of the window
+inline constexpr const char* displayStateMobile = "DisplayStateMobile.plist"; // of the window, on mobile devices
+inline constexpr const char* projectData = "ProjectData";                     // the project itself
+inline constexpr const char* araFiles = "ARA Files";                          // data of plug-ins
+inline constexpr const char* autosave = "Autosave";                           // unsaved changes
+inline constexpr const char* backups = "Project File Backups";                // folder of backups
 } // namespace ProjectLayout
 
-/// Null for a null folder.
+/// The URL of an item in a folder; null for a null folder.
 platform::URLRef itemIn(const platform::URLRef& folder, const char* name, bool isDirectory);
-/// Created first where that is asked for; null, with errno, when it cannot be.
+/// The URL of a folder in a folder, created first with CreateDirectories::yes; null, with errno, when that fails.
 platform::URLRef folderIn(const platform::URLRef& folder, const char* name, CreateDirectories create);
-/// The path by which the system reaches a location; empty for a null one, and one without an absolute path.
+/// The path by which the system reaches a location; empty for a null URL and one without an absolute path.
 const std::string& pathOf(const platform::URLRef& url);
-/// Whether anything is there, links followed.
+/// Whether something is there, links followed.
 bool itemExists(const std::string& path);
+/// Whether a folder is there, links followed.
 bool folderExists(const std::string& path);
-/// Whether both paths lead to one item, whatever links they take.
+/// Whether both paths lead to one item, links followed.
 bool isSameItem(const std::string& a, const std::string& b);
-/// Whether one of the names by which `path` goes on behind `folder` is a symbolic link.
+/// Whether a component of `path` below `folder` is a symbolic link.
 bool hasLinkBelow(const std::string& folder, const std::string& path);

@@ -8,9 +8,9 @@
 #include <cstddef>
 #include <optional>
 
-/// No list of a project comes near it; a file that claims to be longer is not read.
+/// The limit, in bytes, above which a list is not read; real ones are far below.
 inline constexpr std::size_t kLargestProjectList = std::size_t{512} << 20;
 
-/// Null for what is no property list of a dictionary.
+/// The dictionary of a property list; null when the bytes are not one.
 std::optional<platform::Dictionary>
 dictionaryFromBytes(BytesView bytes, platform::PropertyListReading reading = platform::PropertyListReading::lenient);

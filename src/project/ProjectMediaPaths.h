@@ -1,19 +1,21 @@
-// The rule by which a stored media path becomes an absolute one: docs/formats/project-package.md.
+// The rule by which a stored media path becomes absolute: docs/formats/project-package.md.
 #pragma once
 
 #include <string>
 #include <string_view>
 
-/// Without ".", ".." and double slashes, by its text; ".." at the root stays there.
+/// The path without ".", ".." and double slashes, judged by its text; ".." at the root stays at the root.
 std::string standardizedPath(std::string_view path);
 
+/// Makes the stored paths of one package absolute.
 class ProjectMediaPaths {
 public:
-    /// The package's absolute path, without a slash at its end.
+    /// Takes the package's absolute path, without a slash at its end.
     ProjectMediaPaths(std::string packagePath, bool hasProjectFolder);
 
-    /// False for what names no file: an empty path, one with a NUL, and one that says that it lies in a package and
-    /// then leads out of it. `result` is left with anything then; its memory is used again and again.
+    /// False for a path that names no file: an empty one, one with a NUL, and one that claims to lie in the package
+    /// but leads out of it. `result` is undefined then. Callers pass the same `result` again, so that its memory is
+    /// reused.
     bool makeAbsolute(std::string_view stored, std::string& result) const;
 
 private:

@@ -1,4 +1,4 @@
-// Values of property lists read as what their keys promise; anything else reads as absent.
+// Values of property lists, read as what their keys promise; anything else reads as absent.
 #pragma once
 
 #include "platform/core/Value.h"
@@ -7,8 +7,8 @@
 #include <cstdint>
 #include <optional>
 
-/// A number of any kind; booleans are 0 and 1, as other writers store them. Fractions are cut off. Null for other
-/// values, and for numbers that do not fit.
+/// A number of any kind as an integer; booleans are 0 and 1, as other writers store them, and fractions are cut off.
+/// Null for other values, and for numbers that do not fit.
 inline std::optional<std::int64_t> integerOf(const platform::Value* value)
 {
     if (value == nullptr)
@@ -22,6 +22,7 @@ inline std::optional<std::int64_t> integerOf(const platform::Value* value)
     return std::nullopt;
 }
 
+/// A number of any kind; 0 for other values and for numbers that are not finite.
 inline double realOf(const platform::Value* value)
 {
     const auto* real = value != nullptr ? value->get<double>() : nullptr;
@@ -30,6 +31,7 @@ inline double realOf(const platform::Value* value)
     return static_cast<double>(integerOf(value).value_or(0));
 }
 
+/// The value of a key; null when absent.
 inline const platform::Value* valueFor(const platform::Dictionary& dictionary, const char* key)
 {
     const auto found = dictionary.find(std::string_view(key));

@@ -7,62 +7,63 @@
 #include <cstdint>
 #include <vector>
 
-/// What is known of a registered file. The samples are the container's.
+/// What is known of a registered file; the samples belong to the server.
 struct TFileInfo {
-    CFileRef ref;
-    const float* samples = nullptr; // interleaved; null when they were not loaded
-    float sampleRate = 0;
-    std::uint32_t channels = 0;
-    std::uint32_t frames = 0;
+    CFileRef ref;                   // the file
+    const float* samples = nullptr; // interleaved, -1 to 1; null when they were not loaded
+    float sampleRate = 0;           // in Hz
+    std::uint32_t channels = 0;     // interleaved in `samples`
+    std::uint32_t frames = 0;       // samples of each channel
 };
 
-/// Owns the samples. Used by one thread. Client ids are positive.
+/// Owns the samples of all registered files. Client ids are positive. One thread.
 class KT_EXPORT CFileServer {
 public:
-    static constexpr unsigned int kRefused = 0xFFFFFFFF;
+    static constexpr unsigned int kRefused = 0xFFFFFFFF; // the result of Register that refuses a file
 
-    /// No more than `maxFiles` files can be registered.
+    /// A server for at most `maxFiles` files.
     explicit CFileServer(int maxFiles);
     ~CFileServer();
     CFileServer(const CFileServer&) = delete;
     CFileServer& operator=(const CFileServer&) = delete;
 
-    /// The smallest id that is not registered. It is not registered by that.
+    /// The smallest id that no file has a client of. Asking does not register it.
     unsigned int CreateNewClientId() const;
-    /// The number of the file's clients. kRefused for id 0, for what is no existing file, and for a new file when there
-    /// are `maxFiles`; 0 when it cannot be opened or loaded. Samples of files with the extension "ubs" are not loaded.
+    /// Registers a client of a file, and returns the number of the file's clients. kRefused for id 0, for a reference
+    /// that is no existing file, and for a new file beyond `maxFiles`; 0 when the file cannot be opened or loaded.
+    /// Samples of files with the extension "ubs" are not loaded.
     unsigned int Register(unsigned int clientId, const CFileRef* ref);
-    /// Removes the client from all files, and the files that it was the last client of. 0.
+    /// Removes the client from all files, and the files that it was the last client of. Always 0.
     unsigned int UnRegister(unsigned int clientId);
 
-    /// Loads a file into a container; with `skipSamples` only sees whether it can be opened, and frees the container's
-    /// samples. False, and the samples freed, when it cannot be loaded.
+    /// Loads a file into a container; with `skipSamples` only tries to open it, and frees the container's samples.
+    /// False, and the samples freed, on failure.
     bool Open(const CFileRef* ref, TContainer& container, bool skipSamples);
-    /// Frees the samples.
+    /// Frees the samples of a container.
     void Close(TContainer& container);
-    /// Adds a client that is not there yet; the number of clients.
+    /// Adds a client unless it is there; the number of clients.
     unsigned int Retain(unsigned int clientId, TContainer& container);
-    /// Removes a client that is there; the number of clients left.
+    /// Removes a client if it is there; the number of clients left.
     unsigned int Release(unsigned int clientId, TContainer& container);
 
-    /// All zero, with an invalid reference, when the file is not registered.
+    /// The facts of a file; all zero, with an invalid reference, when it is not registered.
     TFileInfo GetFileInfo(const CFileRef* ref) const;
-    /// Of every file of the client, in the order of registration. Valid until the next call.
+    /// The facts of every file of the client, in the order of registration; valid until the next call.
     const std::vector<TFileInfo>& GetFileInfoVector(unsigned int clientId);
-    /// Lets the first registered file of the same name (in the same case), sample rate, channels and frames be
-    /// `newFile` from now on: `oldFile` becomes the reference that it had, and the ids of its clients are returned.
-    /// None, and nothing changed, when there is no such file, and when another is registered under the new reference.
-    /// The samples stay as they are.
+    /// Makes the first registered file of the same name (in the same case), sample rate, channels and frames be
+    /// `newFile` from now on: `oldFile` gets its former reference, and the ids of its clients are returned. Empty,
+    /// and nothing changed, when there is no such file or another is registered as `newFile`. The samples stay.
     std::vector<unsigned int> UpdateAudioFileInfo(const CFileRef* newFile, CFileRef& oldFile);
-    /// The name of the client's first file, 255 bytes at most; empty when it has none. Kept: in one buffer for the
-    /// whole process, which the next call overwrites.
+    /// The name of the client's first file, 255 bytes at most; empty when it has none. Kept: the text lies in one
+    /// buffer for the whole process, which the next call overwrites.
     const char* GetFileNameFromFirstRef(unsigned int clientId, bool keepExtension) const;
 
+    /// Whether the id is in `ids`, which must be sorted.
     bool ClientIsRegistered(unsigned int clientId, std::vector<unsigned int>& ids) const;
-    /// 0 for none.
+    /// The greatest of the ids; 0 when there are none.
     unsigned int MaxClientId(std::vector<unsigned int>& ids) const;
-    /// In every file, `a` takes the place of `b` and `b` that of `a`. Kept: the registered ids stay as they are, also
-    /// when only one of the two was registered.
+    /// Puts `a` in the place of `b` in every file, and `b` in that of `a`. Kept: the registered ids stay as they are,
+    /// even when only one of the two was registered.
     void SwapClients(unsigned int a, unsigned int b);
 
 private:

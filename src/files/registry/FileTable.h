@@ -7,24 +7,25 @@
 #include <list>
 #include <unordered_map>
 
-/// Enumerates in the order in which the files came. Retains a container that it takes and releases one that it drops,
-/// by its callbacks.
+/// Containers by URL, in the order in which the files came. The table retains a container that it takes and releases
+/// one that it drops, by its callbacks.
 class FileTable {
 public:
-    /// `capacity` is a hint.
+    /// `capacity` is a hint; the callbacks must outlive the table.
     FileTable(std::size_t capacity, const TContainerValueCallbacks& callbacks);
     ~FileTable();
     FileTable(const FileTable&) = delete;
     FileTable& operator=(const FileTable&) = delete;
 
     std::size_t size() const { return containers_.size(); }
-    /// Null when there is none; the table's still.
+    /// The container of a URL, still the table's; null when there is none.
     TContainer* find(const platform::URLRef& url) const;
-    /// In the place of the one that the URL has already.
+    /// Stores a container, in the place of one that the URL has already.
     void set(const platform::URLRef& url, TContainer* container);
+    /// Drops the container of a URL, if there is one.
     void remove(const platform::URLRef& url);
 
-    /// In order. What is removed meanwhile makes them invalid.
+    /// In order; removing a file invalidates iterators to it.
     auto begin() const { return containers_.begin(); }
     auto end() const { return containers_.end(); }
 

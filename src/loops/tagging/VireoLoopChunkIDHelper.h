@@ -3,8 +3,10 @@
 
 #include "loops/tagging/ChunkIDs.h"
 
+/// The ids of the loop chunks (loops/tagging/ChunkIDs.h), by the names of their accessors.
 class VireoLoopChunkIDHelper {
 public:
+    /// Each the id of the chunk that it names.
     static constexpr std::uint32_t silenceChunkID() { return tagging::kSilence; }
     static constexpr std::uint32_t basicTaggingChunkID() { return tagging::kBasicTagging; }
     static constexpr std::uint32_t categoriesChunkID() { return tagging::kCategories; }
@@ -25,11 +27,13 @@ public:
     {
         return chunkID == tagging::kMIDIFile ? tagging::kCAFMIDIChunk : tagging::kCAFUUIDChunk;
     }
+    /// The UUID of a chunk in CAF; null for an id without one.
     static const tagging::UUIDBytes* cafUUIDChunkIDForChunkID(std::uint32_t chunkID)
     {
         return chunkIDToCafChunkUUID(chunkID);
     }
+    /// The UUID of the silence chunk, which has no id.
     static const tagging::UUIDBytes* cafSilenceUUIDChunkID() { return &tagging::kSilenceUUID; }
-    /// cafUUID:isEqualTo:
+    /// `cafUUID:isEqualTo:`: compares all 16 bytes; two nulls are equal.
     static bool cafUUIDIsEqualTo(const std::uint8_t* a, const std::uint8_t* b) { return UUIDIsEqual(a, b); }
 };

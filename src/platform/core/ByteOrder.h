@@ -1,9 +1,9 @@
-// Fields of a file's records between the order of the file and the host's.
+// Fields of records, turned between the byte order of a file and the host's.
 #pragma once
 
 #include "platform/core/Packed.h"
 
-/// Turns each from `order` to the host's, or back; nothing where they are the same.
+/// Turns each field from `order` to the host's byte order, or back; does nothing where they are the same.
 template <class... T>
 void turnFields(std::endian order, Packed<T>&... fields)
 {

@@ -8,11 +8,13 @@
 #include <bit>
 
 /// Reads fields one after the other from bytes that it does not own. A read past the end yields zero (or an empty
-/// view), moves to the end and makes `ok()` false for good, so that a parser may read a whole record and test once.
+/// view), moves to the end and makes ok() false for good, so that a parser can read a whole record and test once.
 class ByteReader {
 public:
+    /// `order` is the byte order of every number that is read.
     explicit ByteReader(BytesView bytes, std::endian order = std::endian::big) : bytes_(bytes), order_(order) {}
 
+    /// The next number of `sizeof(T)` bytes, integer or floating point.
     template <class T>
     T read()
     {
@@ -20,14 +22,14 @@ public:
         return field.empty() ? T{} : load<T>(field.data(), order_);
     }
 
-    /// Ids are four characters in file order, whatever the byte order of the numbers.
+    /// The next four characters, in file order whatever the byte order of the numbers.
     FourCC readFourCC()
     {
         const BytesView field = take(4);
         return field.empty() ? 0 : loadBE<FourCC>(field.data());
     }
 
-    /// The next `count` bytes, or an empty view when fewer are left.
+    /// A view of the next `count` bytes; empty when fewer are left.
     BytesView take(std::size_t count)
     {
         if (count > remaining()) {
@@ -40,10 +42,15 @@ public:
         return taken;
     }
 
+    /// Passes over `count` bytes; more than are left is an error, as in take().
     void skip(std::size_t count) { take(count); }
+    /// A view of the bytes that are left; the position stays.
     BytesView rest() const { return bytes_.subspan(position_); }
+    /// In bytes from the start.
     std::size_t position() const { return position_; }
+    /// How many bytes are left.
     std::size_t remaining() const { return bytes_.size() - position_; }
+    /// False once a read went past the end.
     bool ok() const { return ok_; }
 
 private:

@@ -1,4 +1,4 @@
-// The two ways in which raw bytes are passed: owned, and looked at.
+// Raw bytes, owned and looked at.
 #pragma once
 
 #include <cstddef>
@@ -6,7 +6,9 @@
 #include <string_view>
 #include <vector>
 
+/// Bytes that their holder owns.
 using Bytes = std::vector<std::byte>;
+/// Bytes that somebody else owns, valid as long as those.
 using BytesView = std::span<const std::byte>;
 
 /// The bytes of `text`, without a terminator.

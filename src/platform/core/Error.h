@@ -17,14 +17,14 @@ inline constexpr const char* system = "system";           // the code is a syste
 
 /// What went wrong: a domain, a code in it, a text for people, and the error below, if any.
 struct Error {
-    std::string domain;
-    std::int64_t code = 0;
-    std::string description;
-    std::shared_ptr<const Error> underlying;
-    Dictionary userInfo;
+    std::string domain;                      // one of ErrorDomain, or a domain of the room that fails
+    std::int64_t code = 0;                   // its meaning depends on the domain
+    std::string description;                 // a sentence for people, in English
+    std::shared_ptr<const Error> underlying; // the cause; null when none is known
+    Dictionary userInfo;                     // details, by keys that the function documents
 };
 
-/// Fills `*error` when the caller asked for it; always false, for `return fail(error, …)`.
+/// Fills `*error` unless the caller passed null. Always false, for `return fail(error, …)`.
 inline bool fail(Error* error, const char* domain, std::int64_t code, std::string description)
 {
     if (error != nullptr)

@@ -4,23 +4,24 @@
 #include <cstdint>
 #include <string>
 
-/// Unsigned 32-bit value whose most significant byte is the first character, in every container, whatever its
-/// byte order: "FORM" is 0x464F524D.
+/// An unsigned 32-bit value whose most significant byte is the first character, in every container, whatever its byte
+/// order: "FORM" is 0x464F524D.
 using FourCC = std::uint32_t;
 
+/// The code of four characters, in file order.
 constexpr FourCC fourCC(char a, char b, char c, char d)
 {
     return FourCC{static_cast<unsigned char>(a)} << 24 | FourCC{static_cast<unsigned char>(b)} << 16 |
            FourCC{static_cast<unsigned char>(c)} << 8 | FourCC{static_cast<unsigned char>(d)};
 }
 
-/// `fourCC("FORM")`: a literal of exactly four characters.
+/// The code of a literal of exactly four characters: `fourCC("FORM")`.
 constexpr FourCC fourCC(const char (&text)[5])
 {
     return fourCC(text[0], text[1], text[2], text[3]);
 }
 
-/// The four characters of `code`; a byte that is not printable ASCII, and the backslash, as `\xNN`.
+/// The four characters of `code`; a backslash, and a byte that is not printable ASCII, as `\\xNN`.
 inline std::string fourCCText(FourCC code)
 {
     constexpr char digits[] = "0123456789ABCDEF";

@@ -1,4 +1,4 @@
-// What hash tables with open addressing share: their slots, a power of two of them, where a collision goes to the next.
+// Hash tables with open addressing: a power of two of slots, where a collision goes to the next one.
 #pragma once
 
 #include <algorithm>
@@ -6,8 +6,8 @@
 #include <utility>
 #include <vector>
 
-/// Makes four times as many of them, 64 at least. A slot has the `hash` by which it was placed and a `number`, which is
-/// 0 where it is free.
+/// Makes four times as many slots, at least 64. A slot has the `hash` by which it is placed and a `number`, which is
+/// 0 where the slot is free. Throws std::bad_alloc.
 template <class Slot>
 void growHashSlots(std::vector<Slot>& slots)
 {

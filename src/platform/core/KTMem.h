@@ -1,11 +1,11 @@
-// The memory block of the suite: bytes and their size. Shared through std::shared_ptr where several owners need it.
+// The memory block of the suite: bytes and their size, shared through std::shared_ptr where several owners need it.
 #pragma once
 
 #include "platform/core/Export.h"
 
 #include <cstddef>
 
-/// Owns its bytes; movable, not copyable. Growing keeps the content and fills what is new with zeros. Appending in
+/// Owns its bytes; movable, not copyable. Growing keeps the content and fills the new part with zeros. Appending in
 /// small steps costs amortised constant time.
 class KT_EXPORT KTMem {
 public:
@@ -16,14 +16,18 @@ public:
     KTMem& operator=(KTMem&& other) noexcept;
     ~KTMem();
 
-    /// Replaces the content by `size` zero bytes; false, and the block unchanged, when memory is short.
+    /// Replaces the content with `size` zero bytes. False, and the block unchanged, when memory is short.
     bool allocate(std::size_t size);
-    /// Keeps the first min(old, new) bytes; false, and the block unchanged, when memory is short.
+    /// Changes the size, and keeps the first min(old, new) bytes. False, and the block unchanged, when memory is
+    /// short.
     bool reallocate(std::size_t size);
+    /// Gives the memory back; the size is 0 then.
     void free();
 
+    /// Each the first byte, null while the block is empty; valid until the size changes.
     std::byte* data() { return data_; }
     const std::byte* data() const { return data_; }
+    /// In bytes.
     std::size_t size() const { return size_; }
 
 private:

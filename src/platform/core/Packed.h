@@ -1,5 +1,5 @@
-// Integers without alignment, and their loads and stores in a stated byte order. Structs that are file layouts are
-// made of Packed members, so that their size and offsets are those of the file.
+// Integers without alignment, and their loads and stores in a stated byte order. Structs that are file layouts have
+// Packed members, so that their size and offsets are those of the file.
 #pragma once
 
 #include <array>
@@ -23,7 +23,7 @@ constexpr T byteSwapped(T value)
         return static_cast<T>(__builtin_bswap64(static_cast<std::uint64_t>(value)));
 }
 
-/// `value` in host order brought to `order`, or back.
+/// `value`, turned from host order to `order`, or back.
 template <class T>
 constexpr T inByteOrder(T value, std::endian order)
 {
@@ -44,12 +44,14 @@ T load(const void* from, std::endian order)
     }
 }
 
+/// An integer or float from unaligned memory, big-endian.
 template <class T>
 T loadBE(const void* from)
 {
     return load<T>(from, std::endian::big);
 }
 
+/// An integer or float from unaligned memory, little-endian.
 template <class T>
 T loadLE(const void* from)
 {
@@ -69,24 +71,28 @@ void store(void* to, T value, std::endian order)
     }
 }
 
+/// Writes an integer or float to unaligned memory, big-endian.
 template <class T>
 void storeBE(void* to, T value)
 {
     store(to, value, std::endian::big);
 }
 
+/// Writes an integer or float to unaligned memory, little-endian.
 template <class T>
 void storeLE(void* to, T value)
 {
     store(to, value, std::endian::little);
 }
 
-/// A `T` of alignment 1, held in the byte order in which it was read until `turnFields` (ByteOrder.h) turns it.
+/// A `T` of alignment 1. It stays in the byte order in which it was read until `turnFields` (ByteOrder.h) turns it.
 template <class T>
 class Packed {
 public:
     constexpr Packed() = default;
+    /// Holds `value` in host order.
     constexpr Packed(T value) : bytes_(std::bit_cast<Storage>(value)) {}
+    /// The value, taken to be in host order.
     constexpr operator T() const { return std::bit_cast<T>(bytes_); }
     constexpr Packed& operator=(T value)
     {

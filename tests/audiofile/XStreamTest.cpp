@@ -13,6 +13,7 @@
 #include "support/References.h"
 #include "support/TemporaryFolder.h"
 
+#include <bit>
 #include <cstring>
 #include <filesystem>
 #include <random>
@@ -21,7 +22,8 @@ namespace {
 
 XStreamDescription floats(std::uint32_t channels)
 {
-    return {44100, fourCC("lpcm"), 9, 4 * channels, 1, 4 * channels, channels, 32, 0};
+    const std::uint32_t flags = std::endian::native == std::endian::big ? 11 : 9;
+    return {44100, fourCC("lpcm"), flags, 4 * channels, 1, 4 * channels, channels, 32, 0};
 }
 
 /// A stream that is closed at the end.

@@ -3,6 +3,7 @@
 #include "ReaderFrames.h"
 #include "media/decoding/DecoderModule.h"
 #include "media/decoding/PolyphaseSums.h"
+#include "media/samples/SampleRoads.h"
 #include "support/FakeDecoder.h"
 #include "support/Programs.h"
 
@@ -176,6 +177,12 @@ TEST(PolyphaseSums, OfVectorsAreThoseOfThePlainLoop)
             run.to = fast.data();
             runPolyphase(run);
             EXPECT_TRUE(areSame(plain, fast.data())) << channels << " channels, step " << step;
+#if defined(__x86_64__)
+            std::fill(fast.begin(), fast.end(), 0.0F);
+            if (hasFastRoads())
+                runPolyphaseFast(run); // which a processor with wider vectors does not take
+            EXPECT_TRUE(!hasFastRoads() || areSame(plain, fast.data())) << channels << " channels, step " << step;
+#endif
         }
 }
 

@@ -48,8 +48,21 @@ KT_VECTORS inline float total(const Sums& sums)
     return _mm_cvtss_f32(_mm_add_ss(two, _mm_shuffle_ps(two, two, 1)));
 }
 
+#endif
+
+} // namespace
+
+void runPolyphasePlain(PolyphaseRun run)
+{
+    for (std::size_t frame = 0; frame < run.frames; ++frame, run.next())
+        for (std::size_t channel = 0; channel < run.channels; ++channel)
+            *run.to++ = sumOf(run.filters + run.phase * run.taps, run.samples + channel * run.stride, run.taps);
+}
+
+#if defined(KT_AVX2)
+
 /// Processes channels in pairs, which share loaded coefficients.
-KT_VECTORS void runByVectors(PolyphaseRun run)
+KT_VECTORS void runPolyphaseFast(PolyphaseRun run)
 {
     for (std::size_t frame = 0; frame < run.frames; ++frame, run.next()) {
         const float* const filter = run.filters + run.phase * run.taps;
@@ -72,20 +85,13 @@ KT_VECTORS void runByVectors(PolyphaseRun run)
 
 #endif
 
-} // namespace
-
-void runPolyphasePlain(PolyphaseRun run)
-{
-    for (std::size_t frame = 0; frame < run.frames; ++frame, run.next())
-        for (std::size_t channel = 0; channel < run.channels; ++channel)
-            *run.to++ = sumOf(run.filters + run.phase * run.taps, run.samples + channel * run.stride, run.taps);
-}
-
 void runPolyphase(PolyphaseRun run)
 {
 #if defined(KT_AVX2)
+    if (hasWiderRoads())
+        return runPolyphaseWider(run);
     if (hasFastRoads())
-        return runByVectors(run);
+        return runPolyphaseFast(run);
 #endif
     runPolyphasePlain(run);
 }

@@ -39,5 +39,9 @@ struct PolyphaseRun {
 void runPolyphase(PolyphaseRun run);
 /// As above, without vectors.
 void runPolyphasePlain(PolyphaseRun run);
+/// The same by the vectors of AVX2, and by those of AVX-512, which hold all sums of a channel. Only for x86-64, where
+/// hasFastRoads and hasWiderRoads (media/samples/SampleRoads.h) say that the processor has them.
+void runPolyphaseFast(PolyphaseRun run);
+void runPolyphaseWider(PolyphaseRun run);
 
 } // namespace platform

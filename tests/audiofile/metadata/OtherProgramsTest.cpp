@@ -14,6 +14,9 @@
 
 #include <gtest/gtest.h>
 
+#include <array>
+#include <bit>
+
 namespace {
 
 /// The body of the first chunk of an id in a whole RIFF or FORM file; fails the test when there is none.
@@ -97,6 +100,9 @@ SF_INSTRUMENT twoLoops()
     return instrument;
 }
 
+// libsndfile's marks are numbers that lie in memory as they do in a file.
+constexpr auto kDataMark = std::bit_cast<std::int32_t>(std::array{'d', 'a', 't', 'a'});
+
 } // namespace
 
 TEST(MetadataOfOtherPrograms, SamplerOfLibsndfile)
@@ -121,14 +127,14 @@ TEST(MetadataOfOtherPrograms, CuesOfLibsndfile)
     cues.cue_count = 2;
     cues.cue_points[0] = {.indx = 7,
                           .position = 5,
-                          .fcc_chunk = 0x61746164,
+                          .fcc_chunk = kDataMark,
                           .chunk_start = 0,
                           .block_start = 0,
                           .sample_offset = 5,
                           .name = "verse"};
     cues.cue_points[1] = {.indx = 9,
                           .position = 50,
-                          .fcc_chunk = 0x61746164,
+                          .fcc_chunk = kDataMark,
                           .chunk_start = 0,
                           .block_start = 0,
                           .sample_offset = 50,

@@ -9,7 +9,6 @@
 #include <cerrno>
 #include <cstring>
 #include <map>
-#include <ranges>
 #include <sys/stat.h>
 #include <unistd.h>
 
@@ -47,8 +46,8 @@ DecodeTargets::DecodeTargets(const std::string& out, const DecodeFormat& format)
 
 DecodeTargets::~DecodeTargets()
 {
-    for (const std::string& folder : std::views::reverse(made_))
-        ::rmdir(folder.c_str());
+    for (auto folder = made_.rbegin(); folder != made_.rend(); ++folder)
+        ::rmdir(folder->c_str());
 }
 
 std::string DecodeTargets::nameOf(const FoundFile& file) const

@@ -5,6 +5,7 @@
 
 #include <algorithm>
 #include <cmath>
+#include <memory>
 #include <numbers>
 #include <numeric>
 
@@ -60,8 +61,12 @@ PolyphaseResampler::PolyphaseResampler(std::uint32_t channels, std::size_t taps,
       taps_(taps),
       phases_(phases),
       step_(step),
-      filters_(phases * taps)
+      coefficients_(phases * taps + PolyphaseRun::kSideBySide)
 {
+    void* start = coefficients_.data();
+    std::size_t room = coefficients_.size() * sizeof(float);
+    filters_ = static_cast<float*>(
+        std::align(PolyphaseRun::kSideBySide * sizeof(float), phases * taps * sizeof(float), start, room));
     buildFilters(factor);
     reset();
 }
@@ -82,7 +87,7 @@ void PolyphaseResampler::buildFilters(double factor)
                 (angle == 0 ? 1 : std::sin(angle) / angle) * bessel0(kKaiserBeta * std::sqrt(1 - place * place));
             sum += filter[tap];
         }
-        std::transform(filter.begin(), filter.end(), filters_.begin() + static_cast<std::ptrdiff_t>(phase * taps_),
+        std::transform(filter.begin(), filter.end(), filters_ + phase * taps_,
                        [sum](double value) { return static_cast<float>(value / sum); });
     }
 }
@@ -140,7 +145,7 @@ std::int32_t PolyphaseResampler::convert(const float* from, std::uint32_t taken,
     made = static_cast<std::uint32_t>(frames);
     if (frames == 0)
         return kStatusOK;
-    runPolyphase({.filters = filters_.data(),
+    runPolyphase({.filters = filters_,
                   .taps = taps_,
                   .phases = phases_,
                   .step = step_,

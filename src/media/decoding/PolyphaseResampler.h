@@ -27,7 +27,8 @@ private:
 
     std::size_t channels_, taps_, phases_;
     std::size_t step_; // from one output frame to the next, in phases
-    std::vector<float> filters_;
+    std::vector<float> coefficients_;
+    float* filters_ = nullptr;   // the first 64-byte boundary in `coefficients_`
     std::vector<float> samples_; // channel after channel, `capacity_` apart
     std::size_t capacity_ = 0;
     std::size_t filled_ = 0;   // frames present

@@ -27,8 +27,8 @@ constexpr double kAbsoluteGate = -70;  // LUFS; quieter sound is ignored everywh
 constexpr double kRelativeGate = 0.01; // of the mean: -20 LU
 
 // WAVE's channel mask.
-constexpr std::uint32_t kFrontLeft = 1U << 0, kFrontRight = 1U << 1, kFrontCenter = 1U << 2, kEffects = 1U << 3,
-                        kBackLeft = 1U << 4, kBackRight = 1U << 5, kSideLeft = 1U << 9, kSideRight = 1U << 10;
+constexpr std::uint32_t kFrontLeft = 1U << 0, kFrontRight = 1U << 1, kEffects = 1U << 3, kBackLeft = 1U << 4,
+                        kBackRight = 1U << 5, kSideLeft = 1U << 9, kSideRight = 1U << 10;
 
 /// Maps a speaker to its position in ITU-R BS.1770-4. Speakers outside 5.1 and 7.1 weigh like the front.
 channel placeOf(std::uint32_t speaker, std::uint32_t speakers)

@@ -51,7 +51,7 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
     const std::endian order = (data[0] & 1) != 0 ? std::endian::big : std::endian::little;
     std::vector<SamplerTagChunk> chunks;
     for (std::size_t at = 1; size - at >= 3;) {
-        const std::size_t length = std::min<std::size_t>(data[at + 1] | data[at + 2] << 8, size - at - 3);
+        const std::size_t length = std::min(data[at + 1] | std::size_t{data[at + 2]} << 8, size - at - 3);
         const auto* const body = reinterpret_cast<const std::byte*>(data) + at + 3;
         chunks.push_back({kIDs[data[at] % std::size(kIDs)], Bytes(body, body + length)});
         at += 3 + length;

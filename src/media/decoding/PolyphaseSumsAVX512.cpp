@@ -25,7 +25,7 @@ KT_WIDE_VECTORS inline __m256 totals(__m512 a, __m512 b)
 
 } // namespace
 
-/// Channels in pairs, which share the loads of the coefficients.
+/// Processes channels in pairs, which share loaded coefficients.
 KT_WIDE_VECTORS void runPolyphaseWider(PolyphaseRun run)
 {
     for (std::size_t frame = 0; frame < run.frames; ++frame, run.next()) {

@@ -1,4 +1,4 @@
-// The command `ktfiles`. Each verb is a file of its own, and registers itself with the command line.
+// The command `ktfiles`. Each verb has a file of its own, and registers itself with the command line.
 #include "platform/Log.h"
 #include "tool/shared/arguments/CommandLine.h"
 #include "tool/shared/arguments/CoordinationFolder.h"
@@ -9,7 +9,7 @@
 
 namespace {
 
-// A file opened while a standard descriptor is closed would take its number, and our output.
+// While a standard descriptor is closed, a newly opened file would get its number, and our output.
 void occupyStandardDescriptors()
 {
     for (const int descriptor : {STDIN_FILENO, STDOUT_FILENO, STDERR_FILENO})
@@ -23,7 +23,7 @@ int main(int argc, char** argv)
 {
     occupyStandardDescriptors();
     std::signal(SIGXFSZ, SIG_IGN);    // a file size limit is an error like a full disk
-    platform::setLogHandler(nullptr); // what went wrong is said in one line of our own
+    platform::setLogHandler(nullptr); // the command reports problems in one line itself
     useCoordinationFolderOfEnvironment();
     return CommandLine().run(argc, argv);
 }

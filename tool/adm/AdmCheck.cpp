@@ -47,12 +47,12 @@ const ElementName* elementNamed(std::string_view name)
     return found == std::end(elementNames) ? nullptr : found;
 }
 
-/// Hears the whole document, also what stands behind a problem that ended the parse.
+/// Receives the whole document, also the part after a problem that ended the parse.
 class Listener : public platform::XMLHandler {
 public:
     explicit Listener(std::vector<ADMDiagnostic>& problems) : problems_(problems) {}
     void setParser(const platform::XMLParser& parser) { parser_ = &parser; }
-    /// Of all prefixed names, one problem.
+    /// Reports all prefixed names as one problem.
     void tellPrefixedNames()
     {
         if (prefixedNames_ == 0)
@@ -95,7 +95,7 @@ private:
     std::vector<ADMDiagnostic>& problems_;
     const platform::XMLParser* parser_ = nullptr;
     std::unordered_set<std::string> ids_;
-    std::unordered_set<std::string> blockIDs_; // of the channel that is open: blocks come by the million
+    std::unordered_set<std::string> blockIDs_; // of the open channel only: blocks come by the million
     std::size_t prefixedNames_ = 0;
     ADMDiagnostic prefixed_;
 };
@@ -117,7 +117,7 @@ std::vector<ADMDiagnostic> checkFurther(AdmSource& source, const ADMDocument& do
     const auto stream = source.stream();
     platform::XMLParser parser(*stream, listener);
     listener.setParser(parser);
-    parser.parse(); // that it is not well-formed has been told
+    parser.parse(); // has reported already that it is not well-formed
     listener.tellPrefixedNames();
     if (!isComplete)
         return problems;

@@ -1,5 +1,5 @@
-// What a check of an ADM document finds beside what the parser raises: IDs that come twice, times that cannot be read,
-// names that are not taken for ADM, and tracks that the file's chunk "chna" (ITU-R BS.2088) tells otherwise.
+// Problems of an ADM document beyond those that the parser raises: duplicate IDs, unreadable times, names that are not
+// taken for ADM, and tracks that the file's chunk "chna" (ITU-R BS.2088) describes differently.
 #pragma once
 
 #include "adm/ADMDocument.h"
@@ -7,6 +7,6 @@
 
 #include <vector>
 
-/// Reads the source a second time. `isComplete` when the document went through to its end: only then is known which
+/// Reads the source a second time. `isComplete` if the document was read to its end, without which nobody knows which
 /// elements there are.
 std::vector<ADMDiagnostic> checkFurther(AdmSource& source, const ADMDocument& document, bool isComplete);

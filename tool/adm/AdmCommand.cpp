@@ -1,4 +1,4 @@
-// ktfiles adm: what an ADM document describes, as a tree or as JSON, and what is wrong with it.
+// ktfiles adm: shows an ADM document as a tree or as JSON, and checks it.
 #include "tool/adm/AdmCheck.h"
 #include "tool/adm/AdmJson.h"
 #include "tool/adm/AdmTree.h"
@@ -28,16 +28,16 @@ struct AdmArguments {
     unsigned threads = 0;
 };
 
-/// A document, and what was said about it.
+/// A document, and the messages about it.
 struct ReadDocument {
     std::unique_ptr<ADMDocument> document;
     std::vector<ADMDiagnostic> diagnostics;
-    bool isComplete = false; // it went through to its end, which strict rules may forbid
+    bool isComplete = false; // read to its end, which strict rules may prevent
 };
 
 ADMDocumentOptions optionsFor(const AdmArguments& arguments)
 {
-    // A check goes past a problem wherever that can be done, to find the others.
+    // A check continues past problems where possible, to find the others.
     return {.continuePastUnresolvedReferences = arguments.isLenient || arguments.isCheck,
             .skipUnsupportedBlocks = arguments.isLenient || arguments.isCheck,
             .silentTrack = arguments.isLenient,
@@ -46,7 +46,7 @@ ADMDocumentOptions optionsFor(const AdmArguments& arguments)
 
 enum class Diagnose : bool { no, yes };
 
-/// Throws the Failure of a file that cannot be read, but not for what is wrong with the document.
+/// Throws a Failure if the file cannot be read, but not for problems of the document.
 ReadDocument readFrom(AdmSource& source, const AdmArguments& arguments, bool quiet, Diagnose diagnose)
 {
     ReadDocument read;
@@ -67,7 +67,7 @@ ReadDocument readFrom(AdmSource& source, const AdmArguments& arguments, bool qui
     try {
         read.isComplete = read.document->parseStream(*stream);
     } catch (const ADMException&) {
-        // The handler has heard of it, and with its place.
+        // The handler has reported it, with its place.
     }
     read.document->setDiagnosticsHandler(nullptr);
     read.document->setProgressHandler(nullptr);
@@ -82,7 +82,7 @@ std::string problemText(const ADMDiagnostic& diagnostic)
     return diagnostic.kind + ": " + diagnostic.text;
 }
 
-/// "FILE:LINE:COLUMN", as programs that go to such places expect it; the file alone for what has no place in it.
+/// "FILE:LINE:COLUMN", the form that editors can jump to; the file alone if there is no place.
 std::string placeText(const std::string& path, const ADMDiagnostic& diagnostic)
 {
     if (diagnostic.position.line == 0)
@@ -104,7 +104,7 @@ public:
     bool run()
     {
         bool areFine = true;
-        // What is shown is told while it is read; the findings of a check are held.
+        // Documents report problems while they are read; a check holds its findings back.
         const FileLoop loop{
             .threads = arguments_.isCheck ? arguments_.threads : 1, .doing = "checking", .quiet = options_.quiet};
         const bool good = forEachFile(
@@ -123,7 +123,7 @@ public:
     }
 
 private:
-    /// Of an XML file below a folder throws OtherKind: web pages begin with a tag, too.
+    /// Throws OtherKind for an XML file below a folder that is no ADM: web pages begin with a tag, too.
     static void requireMeant(const FoundFile& file, const AdmSource& source)
     {
         if (file.isBelowFolder() && !source.isAudio())
@@ -137,7 +137,7 @@ private:
         AdmSource source(file.path);
         requireMeant(file, source);
         ReadDocument read = readDocument(source, arguments_.isLenient ? Diagnose::yes : Diagnose::no);
-        // To know the place of everything costs a ninth of the time, which only documents with a problem pay.
+        // Tracking positions takes a ninth longer, so only documents with a problem are read again for them.
         if (!read.isComplete && !arguments_.isLenient)
             read = readDocument(source, Diagnose::yes);
         if (!read.isComplete) {
@@ -150,7 +150,7 @@ private:
         return true;
     }
 
-    /// By any thread.
+    /// May be called by any thread.
     std::vector<ADMDiagnostic> check(const FoundFile& file) const
     {
         const FileAccess access = accessForReading(file.path, {.quiet = options_.quiet});
@@ -235,7 +235,7 @@ private:
         output_.print("{}: {}\n", printable(path), text.empty() ? "no ADM elements" : text);
     }
 
-    /// What was let pass. On standard error, since standard output has a form of its own to keep.
+    /// Reports what was tolerated, on standard error, because standard output has a form of its own.
     void reportDiagnostics(const std::string& path, const std::vector<ADMDiagnostic>& diagnostics)
     {
         if (options_.quiet || diagnostics.empty())

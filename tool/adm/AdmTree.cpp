@@ -6,7 +6,7 @@
 
 namespace {
 
-// Deeper ones could be drawn on no terminal, and there may be as many as there are objects.
+// Deeper levels fit no terminal, and there may be as many as objects.
 constexpr std::size_t kMostLevels = 24;
 
 constexpr std::string_view kSilentTrack = "ATU_00000000";
@@ -57,7 +57,7 @@ void AdmTree::noteHeld(const Element& holder, const std::vector<Element*>& eleme
 template <class Element>
 void AdmTree::showRoots(const ADMElementTable<Element>& elements)
 {
-    // What is held by another of its kind is left to that, unless they hold each other.
+    // An element that another of its kind holds is shown there, unless they hold each other.
     for (const bool isHeld : {false, true})
         for (const Element& element : elements) {
             if (held_.contains(&element) == isHeld && stateOf(element) == State::untouched)
@@ -187,7 +187,7 @@ void AdmTree::addChildren(Items& items, const ADMAudioPackFormat& pack) const
 void AdmTree::addChildren(Items& items, const ADMAudioChannelFormat& channel) const
 {
     const ADMAudioChannelFormat::Blocks& blocks = channel.audioBlockFormat();
-    // A line that says "1 more" takes the room of the one.
+    // A line "1 more" would take as much room as the block itself.
     const std::size_t count = blocks.size() <= mostBlocks_ + 1 ? blocks.size() : mostBlocks_;
     items.reserve(count + 1);
     for (std::size_t i = 0; i < count; ++i)
@@ -196,8 +196,8 @@ void AdmTree::addChildren(Items& items, const ADMAudioChannelFormat& channel) co
         items.emplace_back(More{blocks.size() - count});
 }
 
-// A track is one line with its format and its stream; what they lead to is nearly always the pack and the channel of
-// the object, which are there already.
+// A track is one line with its format and stream. These nearly always lead to the object's pack and channel, which are
+// shown already.
 void AdmTree::addChildren(Items& items, const ADMAudioTrackUID& track)
 {
     addIfNew(items, track.audioPackFormat());

@@ -1,5 +1,5 @@
-// An ADM document as a tree: programmes, their contents, objects, packs, channels and blocks, and behind them what is
-// in no programme.
+// An ADM document as a tree: programmes, their contents, objects, packs, channels and blocks, followed by what no
+// programme contains.
 #pragma once
 
 #include "adm/ADMDocument.h"
@@ -13,11 +13,11 @@
 #include <variant>
 #include <vector>
 
-/// Every element is shown with what it holds once; where another refers to it again, by a mark only. So circles end,
-/// and the tree is never larger than the document.
+/// Shows every element with its content once, and marks further references to it. So circles end, and the tree is never
+/// larger than the document.
 class AdmTree {
 public:
-    /// `mostBlocks` of a channel are shown.
+    /// Shows `mostBlocks` blocks of each channel.
     AdmTree(AdmTreeWriter& writer, std::size_t mostBlocks) : writer_(writer), mostBlocks_(mostBlocks) {}
     void show(const ADMDocument& document);
 
@@ -62,5 +62,5 @@ private:
     std::size_t mostBlocks_;
     std::unordered_map<const ADMElement*, State> states_;
     std::unordered_set<const ADMElement*> held_; // by another of the same kind
-    std::deque<Item> putOff_;                    // what lies too deep for one tree
+    std::deque<Item> putOff_;                    // too deep for the current tree
 };

@@ -12,7 +12,7 @@ constexpr const char* kDim = "\x1b[2m";
 constexpr const char* kRed = "\x1b[31m";
 constexpr const char* kNoColor = "\x1b[0m";
 
-constexpr int kLeastColumns = 24; // for text, however deep it stands
+constexpr int kLeastColumns = 24; // for text at any depth
 
 } // namespace
 

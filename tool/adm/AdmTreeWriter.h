@@ -11,33 +11,33 @@
 class AdmTreeWriter {
 public:
     struct Look {
-        bool isDrawn = true; // else a line is depth, kind, ID, name and details, separated by tabs
+        bool isDrawn = true; // otherwise a line is depth, kind, ID, name and details, separated by tabs
         bool hasColor = false;
         bool hasBlockIDs = false;
-        int columns = 80;       // lines are broken to fit, where they can be
-        std::string linePrefix; // ahead of every plain line
+        int columns = 80;       // lines are broken to fit if possible
+        std::string linePrefix; // precedes every plain line
     };
 
     AdmTreeWriter(Output& output, Look look) : output_(output), look_(std::move(look)) {}
 
-    /// A title, written ahead of the next root, if there is one.
+    /// Sets a title, which is written before the next root, if there is one.
     void beginSection(std::string_view title) { section_ = title; }
-    /// What is added next stands for itself.
+    /// The next node is a root.
     void beginRoot();
-    /// What is added until `leave` stands below what was added last.
+    /// Nodes added until `leave` are below the last one.
     void enter();
     void leave();
-    /// `isLast` of those that stand below the same one; `hasChildren` when others will stand below it.
+    /// `isLast` among its siblings; `hasChildren` if other nodes will follow below it.
     void add(const AdmNode& node, bool isLast, bool hasChildren);
 
-    /// What is written goes nowhere.
+    /// Whether the output is gone.
     bool isUseless() const { return output_.failed(); }
 
 private:
     struct Piece {
         std::string text;
         const char* color = "";
-        const char* separator = ""; // behind it, unless a line ends there
+        const char* separator = ""; // follows it, unless a line ends there
     };
     void addPlain(const AdmNode& node);
     std::vector<Piece> piecesOf(const AdmNode& node) const;
@@ -47,6 +47,6 @@ private:
     Output& output_;
     Look look_;
     std::string_view section_;
-    std::vector<bool> isLast_; // of the ones that stand above, from the root on
+    std::vector<bool> isLast_; // for the nodes above, from the root on
     std::size_t depth_ = 0;
 };

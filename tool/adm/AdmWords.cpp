@@ -16,7 +16,7 @@ using Words = std::vector<std::string>;
 
 constexpr std::int64_t kSecond = 1'000'000;
 
-// Minutes and seconds, with hours where there are any; milliseconds, and finer only where it is needed.
+// Minutes and seconds, with hours if there are any; milliseconds, and finer only if necessary.
 std::string timeText(std::int64_t microseconds)
 {
     const bool isNegative = microseconds < 0;
@@ -35,7 +35,7 @@ std::string timeText(std::int64_t microseconds)
     return text;
 }
 
-// "0:01.000–0:02.500"; empty for what is there from first to last.
+// "0:01.000–0:02.500"; empty for the whole duration.
 std::string spanText(std::int64_t start, std::int64_t end)
 {
     if (start == kADMInvalidTime)
@@ -53,15 +53,15 @@ std::int64_t endOf(std::int64_t start, std::int64_t duration)
     return end;
 }
 
-// At most four digits, which is finer than anything that is heard.
+// At most four digits, which is finer than anything audible.
 std::string numberText(double value)
 {
-    if (std::isinf(value)) // more than a number here can be
+    if (std::isinf(value)) // beyond the range of a double
         return value > 0 ? "∞" : "-∞";
     return fmt::format("{:.4g}", value == 0 ? 0 : value); // no "-0"
 }
 
-// Empty for one that changes nothing.
+// Empty for a gain that changes nothing.
 std::string gainText(float gain, int unit)
 {
     if (gain == (unit == 1 ? 0.0F : 1.0F))
@@ -93,7 +93,7 @@ void addLabels(Words& words, const ADMLabels& labels)
         words.push_back(language + " \"" + text + "\"");
 }
 
-// One axis of a position: "30° left". Nothing at its zero.
+// One axis of a position: "30° left". Nothing at zero.
 void addAxis(std::string& text, double value, std::string_view unit, const char* positive, const char* negative)
 {
     if (value == 0)
@@ -108,7 +108,7 @@ std::string polarText(double azimuth, double elevation)
     if (std::fabs(azimuth) == 180)
         text = "back";
     else
-        addAxis(text, azimuth, "°", "left", "right"); // seen from above, angles go against the clock
+        addAxis(text, azimuth, "°", "left", "right"); // seen from above, angles are counterclockwise
     addAxis(text, elevation, "°", "up", "down");
     return text.empty() ? "front" : text;
 }
@@ -151,7 +151,7 @@ std::string kindText(const std::array<const char*, size>& names, std::int64_t ki
     return kind > 0 && kind < std::int64_t{size} ? names[static_cast<std::size_t>(kind)] : otherwise;
 }
 
-// What is said in a content, with the kinds of ITU-R BS.2076.
+// The dialogue of a content, with the kinds of ITU-R BS.2076.
 std::string dialogueText(const ADMAudioContent& content)
 {
     static constexpr std::array<const char*, 3> nonDialogue{"", "music", "effects"};
@@ -163,7 +163,7 @@ std::string dialogueText(const ADMAudioContent& content)
         return kindText(nonDialogue, content.nonDialogueContentKind(), "no dialogue");
     case 1:
         return kindText(dialogue, content.dialogueContentKind(), "dialogue");
-    default: // also where the document does not say
+    default: // also if the document does not say
         return kindText(mixed, content.mixedContentKind(), "");
     }
 }

@@ -1,4 +1,4 @@
-// The elements of an ADM document in words for people.
+// Describes the elements of an ADM document in words.
 #pragma once
 
 #include "adm/ADMDocument.h"
@@ -8,10 +8,10 @@
 #include <string_view>
 #include <vector>
 
-/// What is told of one element. Names are as the document has them, not made fit for a terminal.
+/// The description of one element. Names are as in the document, not made safe for a terminal.
 struct AdmNode {
     std::string_view kind; // "programme", "block", …
-    std::string name;      // a block has none
+    std::string name;      // empty for a block
     std::string id;
     std::vector<std::string> details;
 };
@@ -23,9 +23,9 @@ AdmNode describe(const ADMAudioPackFormat& pack);
 AdmNode describe(const ADMAudioChannelFormat& channel);
 AdmNode describe(const ADMAudioStreamFormat& stream);
 AdmNode describe(const ADMAudioTrackFormat& track);
-/// Its name is that of its format, or of its channel; its details tell the rest of its chain of formats.
+/// Named after its format or its channel; the details describe the rest of its chain of formats.
 AdmNode describe(const ADMAudioTrackUID& track);
 AdmNode describe(const ADMAudioBlockFormat& block);
 
-/// The library keeps it unsigned, so that one below zero is a very large number there.
+/// The library's value is unsigned, so a negative one appears there as a very large number.
 std::int64_t signedImportance(const ADMAudioPackFormat& pack);

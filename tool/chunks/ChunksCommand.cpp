@@ -15,8 +15,8 @@
 
 namespace {
 
-/// What the body of a chunk begins with that holds chunks of its own: what kind of them; 0 of all others. In Wave64 the
-/// name that its identifier begins with.
+/// The kind of list that a chunk's body begins with, if it contains chunks; else 0. In Wave64, the name in its
+/// identifier.
 FourCC formOf(CAudioFileIO& file, const ContainerExtent& extent, const ChunkEntry& chunk)
 {
     static constexpr std::array lists{fourCC("LIST"), fourCC("list"), fourCC("FORM"), fourCC("CAT ")};
@@ -28,10 +28,10 @@ FourCC formOf(CAudioFileIO& file, const ContainerExtent& extent, const ChunkEntr
     return loadBE<FourCC>(form.data());
 }
 
-// Writes the list of one file chunk by chunk: files of hundreds of thousands of chunks are listed, not held.
+// Writes the list of one file chunk by chunk, without holding it: files may have hundreds of thousands of chunks.
 class ChunkListWriter {
 public:
-    /// With `several` files each line, or heading, says which. One that `follows` another is set off from it.
+    /// With `several` files each line, or heading, names its file. A list that `follows` another is separated from it.
     ChunkListWriter(const OutputOptions& options, JsonRecords& json, std::string path, bool several, bool follows)
         : json_(json),
           form_(outputForm(options)),
@@ -62,7 +62,7 @@ public:
         }
     }
 
-    /// `form` is 0 for a chunk that has none.
+    /// `form` is 0 for a chunk without one.
     bool add(const ChunkEntry& chunk, FourCC form)
     {
         const std::string id = fourCCText(chunk.id), formText = form != 0 ? fourCCText(form) : "";
@@ -84,7 +84,7 @@ public:
         return !output_.failed();
     }
 
-    /// Of a list that has begun; `error` is empty when all went well.
+    /// Ends a list that has begun; `error` is empty if all went well.
     void end(const std::string& error)
     {
         if (form_ == Form::json)
@@ -108,7 +108,7 @@ private:
     }
 
     JsonRecords& json_;
-    JsonWriter* list_ = nullptr; // of the file's object, once that has begun
+    JsonWriter* list_ = nullptr; // in the file's object, once begun
     Form form_;
     bool color_;
     bool several_, follows_;
@@ -118,7 +118,7 @@ private:
     Output& output_ = Output::standard();
 };
 
-// Of a file whose list has begun no Failure is thrown: `writer` ends it with the problem, which is returned.
+// Once the list of a file has begun, a problem is not thrown but returned, and `writer` ends the list with it.
 std::string listFile(const std::string& path, ChunkListWriter& writer, bool quiet)
 {
     const FileAccess access = accessForReading(path, {.quiet = quiet});

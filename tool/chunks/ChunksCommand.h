@@ -1,9 +1,9 @@
-// ktfiles chunks: what containers hold. Its objects are in files of their own.
+// ktfiles chunks: lists what containers hold. Its objects have files of their own.
 #pragma once
 
 class CommandLine;
 class Verb;
 
 void declareChunksGet(CommandLine& commandLine, Verb& chunks);
-/// "add" and "remove".
+/// Declares "add" and "remove".
 void declareChunkEdits(CommandLine& commandLine, Verb& chunks);

@@ -23,7 +23,7 @@ struct EditArguments {
     std::string from;     // of "add"
     bool replace = false; // of "add"
     bool force = false;
-    std::string sidecar; // the extension; empty: only the container itself
+    std::string sidecar; // the extension; empty: the container only
     EditOptions options;
 };
 
@@ -68,7 +68,7 @@ struct EditReport {
     std::int64_t size;  // bytes of their bodies
     std::int64_t replaced = 0;
     std::string backup = {};
-    std::string where = {}; // the file that was changed, if not the one that was named
+    std::string where = {}; // the file that was changed, if it is another
 };
 
 void print(const EditArguments& arguments, const OutputOptions& output, const EditReport& report)
@@ -102,7 +102,7 @@ void print(const EditArguments& arguments, const OutputOptions& output, const Ed
     }
 }
 
-// What --force overrules is told ahead; a file so damaged cannot be compared afterwards.
+// Anything that --force overrules is reported first; so damaged a file cannot be compared afterwards.
 EditScope scopeOf(const EditArguments& arguments, const std::optional<std::string>& objection)
 {
     refuseUnlessForced(objection, arguments.force);
@@ -150,7 +150,7 @@ void refuseBackup(const EditArguments& arguments)
         throw Failure("keeps its chunks beside it and is not changed: there is nothing to back up");
 }
 
-// With a sidecar every older copy goes.
+// With a sidecar every older copy is removed.
 EditReport addAnywhere(EditArguments arguments, const Bytes& body)
 {
     Sidecars sidecars(arguments.file, arguments.sidecar, arguments.options);

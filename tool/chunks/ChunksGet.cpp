@@ -1,4 +1,4 @@
-// ktfiles chunks get: the body of a chunk, to standard output or a file.
+// ktfiles chunks get: writes the body of a chunk to standard output or a file.
 #include "tool/chunks/ChunksCommand.h"
 #include "tool/chunks/SidecarChunks.h"
 #include "tool/shared/access/FileAccess.h"
@@ -24,10 +24,10 @@ struct GetArguments {
     FourCC id = 0;
     std::string out;
     OutputFile::Existing existing = OutputFile::Existing::refuse;
-    std::string sidecar; // the extension; empty: only the container itself
+    std::string sidecar; // the extension; empty: the container only
 };
 
-// A body that would do mischief on a terminal; text, as in "iXML" and "axml", is welcome there.
+// Whether a body could confuse a terminal; text, as in "iXML" and "axml", may be shown there.
 bool isBinary(std::string_view bytes)
 {
     return isMisleading(bytes) || std::any_of(bytes.begin(), bytes.end(), [](char c) {
@@ -36,7 +36,7 @@ bool isBinary(std::string_view bytes)
            });
 }
 
-/// Hands a body to the sink, piece by piece.
+/// Passes a body to the sink, piece by piece.
 using Source = std::function<void(const Sink&)>;
 
 void copyBody(CAudioFileIO& file, std::int64_t offset, std::int64_t size, bool quiet, const Sink& sink)

@@ -29,7 +29,7 @@ bool isRegularFile(const std::string& path)
 
 bool isSameFile(const std::string& a, const std::string& b)
 {
-    std::error_code error; // of those that are not both there
+    std::error_code error; // set if one of the two does not exist
     return a == b || std::filesystem::equivalent(a, b, error);
 }
 
@@ -41,7 +41,7 @@ std::string beside(const std::string& path, const std::string& extension)
 }
 
 struct SidecarNames {
-    std::string metadata, raw; // empty: none
+    std::string metadata, raw; // empty if there is none
 
     SidecarNames(const std::string& file, const std::string& extension)
         : metadata(beside(file, kMetadataExtension)),
@@ -54,7 +54,7 @@ struct SidecarNames {
     }
 };
 
-/// None when it is not there; throws Failure when it cannot be read.
+/// None if the chunk does not exist; throws Failure if it cannot be read.
 std::optional<Bytes> chunkIn(const std::string& container, FourCC id)
 {
     CAudioFileIO file;
@@ -86,7 +86,7 @@ std::int64_t sizeOf(const std::string& path)
     return status.st_size;
 }
 
-/// What an interrupted creation leaves: less than a container, and what is there is the start of one.
+/// Whether the file is what an interrupted creation leaves: the start of a container, shorter than one.
 bool isTorn(const std::string& path)
 {
     constexpr std::int64_t kLeast = 20;
@@ -97,7 +97,7 @@ bool isTorn(const std::string& path)
     return textOf(content).substr(0, kStart.size()) == kStart.substr(0, content.size());
 }
 
-/// Whatever the file holds, it is an AIFF file without sound then, with the one chunk.
+/// Replaces the file's content by an AIFF file without sound that holds the one chunk.
 void makeMetadata(const std::string& path, FourCC id, const Bytes& body)
 {
     CAudioFileIO file;
@@ -156,7 +156,7 @@ Sidecars::Sidecars(const std::string& path, const std::string& extension, const 
     const SidecarNames names(file_, extension);
     metadata_ = names.metadata;
     raw_ = names.raw;
-    options_.inPlace = options_.backup = false; // they are small
+    options_.inPlace = options_.backup = false; // sidecars are small
 }
 
 std::optional<std::string> Sidecars::objection() const
@@ -185,7 +185,7 @@ std::string Sidecars::add(FourCC id, const Bytes& body, bool force)
 
 void Sidecars::addToMetadata(FourCC id, const Bytes& body, bool force)
 {
-    // Whoever else makes it meanwhile is found the next time.
+    // If others create it meanwhile, the next attempt finds it.
     while (!isRegularFile(metadata_))
         if (options_.dryRun || createMetadata(id, body))
             return;
@@ -212,7 +212,7 @@ void Sidecars::addToMetadata(FourCC id, const Bytes& body, bool force)
         edit.apply(EditScope::wholeFile(), [&](const std::string& path) { makeMetadata(path, id, body); });
 }
 
-/// False when somebody else was faster.
+/// False if another process was faster.
 bool Sidecars::createMetadata(FourCC id, const Bytes& body)
 {
     const FileAccess access =
@@ -224,7 +224,7 @@ bool Sidecars::createMetadata(FourCC id, const Bytes& body)
     CTemporaryFile made;
     requireNone(made.Create(metadata_));
     makeMetadata(made.Path(), id, body);
-    // Whoever may read the one may read the other; the owner where that can be had.
+    // Grants the sidecar the readers of the sound; the same owner if possible.
     if (::fchown(made.Descriptor(), sound.st_uid, sound.st_gid) != 0 && errno != EPERM)
         throw Failure(SystemErrorText(errno));
     if (::fchmod(made.Descriptor(), sound.st_mode & 0666) != 0)

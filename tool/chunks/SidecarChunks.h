@@ -1,5 +1,5 @@
-// Chunks of files of any kind: in the file when it is a container, else beside it, as the library's chunk utilities
-// keep them. What is beside it is changed on a copy, like every file that the command edits.
+// Chunks of any file: in the file if it is a container, else beside it, as the library's chunk utilities keep them.
+// Sidecars are changed on a copy, like every file that the command edits.
 #pragma once
 
 #include "platform/core/Bytes.h"
@@ -16,41 +16,40 @@ void addSidecarOption(Verb& verb, std::string& extension);
 
 struct SidecarChunk {
     Bytes body;
-    std::string source; // the path of the file that has it
+    std::string source; // path of the file that holds it
 };
 
-/// Throws Failure when neither the sidecars nor the file have it. Of a metadata sidecar that is a container the chunk,
-/// of any other the whole content.
+/// Throws Failure if neither the sidecars nor the file have it. Yields a chunk of a metadata sidecar that is a
+/// container, and the whole content of any other sidecar.
 SidecarChunk readFromAnywhere(const std::string& path, FourCC id, const std::string& extension);
 
-/// Whether chunks of the file are kept in the file itself. Throws Failure for what cannot be read.
+/// Whether the file holds its chunks itself. Throws Failure if it cannot be read.
 bool keepsItsChunks(const std::string& path);
 
 struct SidecarRemoval {
-    std::int64_t count = 0; // chunks, the raw sidecar counting as one
-    std::string where;      // the path of the first that was changed, or would be; empty: none
+    std::int64_t count = 0; // chunks; the raw sidecar counts as one
+    std::string where;      // path of the first file that was (or would be) changed; empty if none
 };
 
-/// The two files beside a file that hold chunks for it: the metadata sidecar, and the raw one, whose content is one
-/// chunk. Each is locked while it is changed, since several files share them (s.mp3 and s.ogg have s.ktmd). With
-/// `dryRun` nothing is changed. Throws Failure.
+/// The two sidecars of a file: the metadata sidecar holds chunks, the raw sidecar's content is one chunk. Each is
+/// locked while it changes, because several files share them (s.mp3 and s.ogg have s.ktmd). With `dryRun` nothing
+/// changes. Throws Failure.
 class Sidecars {
 public:
-    /// They lie beside the file itself, symbolic links resolved.
+    /// Looks beside the file itself, with symbolic links resolved.
     Sidecars(const std::string& path, const std::string& extension, const EditOptions& options);
 
-    /// The file, symbolic links resolved.
+    /// The file, with symbolic links resolved.
     const std::string& file() const { return file_; }
 
-    /// Why the raw sidecar should not be removed or replaced: it is a recording.
+    /// The reason not to remove or replace the raw sidecar: it is a recording.
     std::optional<std::string> objection() const;
 
-    /// Puts the chunk into the metadata sidecar, which is made where there is none, in the place of those of its id; a
-    /// raw sidecar that is there is written anew. Returns the path of the metadata sidecar in the words
-    /// of the file's.
+    /// Puts the chunk into the metadata sidecar in place of those with its id, and creates the sidecar if necessary;
+    /// rewrites a raw sidecar that exists. Returns the path of the metadata sidecar, spelt like the file's.
     std::string add(FourCC id, const Bytes& body, bool force);
     SidecarRemoval remove(FourCC id);
-    /// Does nothing where there is none.
+    /// Does nothing if there is none.
     void removeRaw();
 
 private:
@@ -59,6 +58,7 @@ private:
     void rewriteRaw(const Bytes& body);
 
     std::string given_, file_;
-    std::string metadata_, raw_; // empty: the name is that of another of the three, which must not pass for two
+    // Empty if the name is that of another of the three files, which must not pass for two.
+    std::string metadata_, raw_;
     EditOptions options_;
 };

@@ -16,7 +16,7 @@ std::uint64_t movedTime(std::uint64_t time, const SoundChange& change)
     return __builtin_add_overflow(change.scaled(time), change.start, &moved) ? UINT64_MAX : moved;
 }
 
-/// A line of the coding history, with its end.
+/// A line of the coding history, with its line end.
 std::string historyLine(const DecodedSound& sound)
 {
     const char* const mode = sound.channels == 1 ? "mono" : sound.channels == 2 ? "stereo" : "multichannel";
@@ -26,7 +26,7 @@ std::string historyLine(const DecodedSound& sound)
 void addToHistory(BroadcastExtension& extension, const DecodedSound& sound)
 {
     std::string history(textOf(extension.codingHistory));
-    history.resize(history.find_last_not_of('\0') + 1); // room that writers leave
+    history.resize(history.find_last_not_of('\0') + 1); // padding that writers leave
     if (!history.empty() && !history.ends_with("\n"))
         history += "\r\n";
     history += historyLine(sound);
@@ -34,7 +34,7 @@ void addToHistory(BroadcastExtension& extension, const DecodedSound& sound)
     extension.codingHistory.assign(bytes.begin(), bytes.end());
 }
 
-/// Numbers between tags of an XML text, found without reading the rest of it.
+/// Replaces numbers between tags of an XML text without parsing the rest of it.
 class NumbersInXML {
 public:
     explicit NumbersInXML(std::string text) : text_(std::move(text)) {}
@@ -50,7 +50,7 @@ public:
         const auto read = std::from_chars(begin, end, value);
         return read.ec == std::errc() && read.ptr == end ? std::optional(value) : std::nullopt;
     }
-    /// Does nothing where there is no number.
+    /// Does nothing if there is no number.
     void set(std::string_view name, std::uint64_t value)
     {
         if (find(name))
@@ -60,7 +60,7 @@ public:
     const std::string& text() const { return text_; }
 
 private:
-    /// Where the text between the first such tags begins, and how long it is.
+    /// Position and length of the text in the first element with this name.
     std::optional<std::pair<std::size_t, std::size_t>> placeOf(std::string_view name) const
     {
         const std::size_t open = text_.find(fmt::format("<{}>", name));
@@ -74,7 +74,7 @@ private:
     std::string text_;
 };
 
-/// A time in two halves of 32 bits. False where it should have been moved and cannot be read.
+/// Moves a time in two halves of 32 bits. False if it should have been moved but cannot be read.
 bool moveTime(NumbersInXML& xml, std::string_view high, std::string_view low, const SoundChange& change)
 {
     const auto highHalf = xml.find(high), lowHalf = xml.find(low);
@@ -116,7 +116,7 @@ Bytes changedIXML(BytesView body, const BroadcastChange& changed, std::vector<st
     bool isTrue = true;
     if (!change.keepsPlaces()) {
         const auto clock = xml.find("TIMESTAMP_SAMPLE_RATE");
-        isTrue = !clock || *clock == sourceRate; // else times are in frames of another length
+        isTrue = !clock || *clock == sourceRate; // otherwise times are in frames of another length
         if (isTrue) {
             isTrue =
                 moveTime(xml, "TIMESTAMP_SAMPLES_SINCE_MIDNIGHT_HI", "TIMESTAMP_SAMPLES_SINCE_MIDNIGHT_LO", change) &&

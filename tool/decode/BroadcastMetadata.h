@@ -1,4 +1,4 @@
-// What broadcast wave files say of their sound, made true of the sound that it was decoded to.
+// Adapts the metadata of broadcast wave files to decoded sound.
 #pragma once
 
 #include "platform/core/Bytes.h"
@@ -12,15 +12,15 @@
 struct BroadcastChange {
     SoundChange change;
     DecodedSound sound;    // as it is written
-    bool isRecoded = true; // its samples are not those of the source, bit by bit
+    bool isRecoded = true; // samples differ from the source's in any bit
     bool keepsChannels = true;
 };
 
-/// The body of a "bext" (EBU Tech 3285), little-endian: the time of its first frame, moved and at the new rate; its
-/// coding history with a line for what was recoded (EBU R 98); its loudness taken out where it is that of another
-/// sound. The same bytes where nothing changes.
+/// The body of a "bext" (EBU Tech 3285), little-endian. Its time is that of the first frame, moved and at the new rate;
+/// its coding history gets a line if the sound was recoded (EBU R 98); its loudness is removed if it was measured on
+/// other sound. The same bytes if nothing changes.
 Bytes changedBroadcastExtension(BytesView body, std::endian order, const BroadcastChange& changed);
 
-/// The body of an "iXML" with its sample rates, bit depth and times by the same rules; all else stays to the byte. What
-/// it goes on saying of the source goes to `stale`, in words.
+/// The body of an "iXML" with sample rates, bit depth and times adapted likewise; everything else stays to the byte.
+/// Statements that remain true of the source only are listed in `stale`, in words.
 Bytes changedIXML(BytesView body, const BroadcastChange& changed, std::vector<std::string>& stale);

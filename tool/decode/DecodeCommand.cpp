@@ -1,4 +1,4 @@
-// ktfiles decode: audio files of any format to linear PCM.
+// ktfiles decode: turns audio files of any format into linear PCM.
 #include "tool/decode/DecodeReport.h"
 #include "tool/decode/DecodeTargets.h"
 #include "tool/shared/arguments/CommandLine.h"
@@ -38,7 +38,7 @@ const NamedDepth* depthNamed(std::string_view name)
     return found != kDepths.end() ? &*found : nullptr;
 }
 
-// The format that is asked for, or that the name of the output means.
+// The format that was requested, or that the output's name implies.
 const DecodeFormat& formatFor(const DecodeArguments& arguments)
 {
     if (arguments.options.wishes.format != nullptr)
@@ -77,12 +77,12 @@ bool runDecode(DecodeArguments& arguments, OutputOptions output)
     const FoundFiles found{names.front(), targets.plan(names)};
     arguments.options.showsProgress = !output.quiet;
     prepareOutputFiles();
-    // Each has a temporary file, and the system's signals remove no more.
+    // Each output has a temporary file, and only so many are removed at a signal.
     const FileLoop loop{.threads = std::min(threadsFor(arguments.threads), kMostTemporaryFiles),
                         .doing = "decoding",
                         .quiet = output.quiet};
     return writeFileByFile(report, found, loop, [&](const FoundFile& file) {
-        requireRegularFile(file.path); // ahead of making a folder for it
+        requireRegularFile(file.path); // before a folder is made for it
         return decodeFile({file.path, targets.outputOf(file)}, arguments.options);
     });
 }
@@ -94,7 +94,7 @@ void addNumber(Verb& verb, const std::string& name, std::optional<Value>& value,
     verb.addNumber(name, value, range, fmt::format("{}, {} to {}", description, range.first, range.second));
 }
 
-// An option whose text means something, or is a mistake.
+// An option whose text is either valid or a usage error.
 template <class Parse, class Take>
 void addText(Verb& verb, const std::string& name, const std::string& label, Parse parse, Take take,
              const std::string& problem, const std::string& description)

@@ -17,7 +17,7 @@
 
 namespace {
 
-/// A file, or standard output; which has nothing behind it once it failed.
+/// A file or standard output. Standard output receives nothing more once it failed.
 class Target {
 public:
     Target(const DecodeJob& job, bool force) : out_(job.output)
@@ -37,7 +37,7 @@ public:
             Output::standard().flush();
         }
     }
-    /// Null for one that cannot be gone back to.
+    /// Null for an output that cannot be rewound.
     OutputFile* regular() const { return file_ && file_->isRegular() ? file_.get() : nullptr; }
     void finish(bool quiet)
     {
@@ -64,8 +64,8 @@ private:
     std::unique_ptr<OutputFile> file_;
 };
 
-/// The header, and then the samples; returns the frames that came. The first samples go out with the header: who reads
-/// from a pipe looks at what the first read gives.
+/// Writes the header, then the samples; returns the number of frames. The first samples are written with the header,
+/// because some readers of a pipe examine only what the first read returns.
 std::int64_t copySound(std::string header, DecodeSource& source, Target& target, bool showsProgress)
 {
     Progress progress("decoding", source.sound().frames, !showsProgress);
@@ -78,11 +78,11 @@ std::int64_t copySound(std::string header, DecodeSource& source, Target& target,
         done += frames;
         progress.advance(frames);
     }
-    target.write(header); // of no samples
+    target.write(header); // there were no samples
     return done;
 }
 
-// A damaged file may end ahead of what it promises.
+// A damaged file may end before the length that it promises.
 void setFrames(const DecodeFrame& frame, std::int64_t frames, const DecodeResult& result, Target& target)
 {
     const std::string header = frame.header(frames);
@@ -104,7 +104,7 @@ void writeSound(DecodeSource& source, const DecodeFrame& frame, Target& target, 
     result.clippedSamples = source.clippedSamples();
 }
 
-/// What of the sound is not as it was made; empty where nothing is known to be.
+/// What is damaged in the sound; empty if nothing is known to be.
 std::string damageTo(const DecodeSource& source)
 {
     if (const std::uint64_t missing = source.missingFrames(); missing > 0)
@@ -157,7 +157,7 @@ DecodeResult decodeFile(const DecodeJob& job, const DecodeOptions& options)
                         .tags = {},
                         .kept = std::move(kept.names)};
     writeSound(source, frame, target, options.showsProgress, result);
-    access.reset(); // ahead of the wait for others who have the output
+    access.reset(); // before waiting for others who hold the output
     if (target.failed())
         return result;
     result.missingFrames = source.missingFrames();

@@ -1,4 +1,4 @@
-// One file decoded to another, or to standard output.
+// Decodes one file to another, or to standard output.
 #pragma once
 
 #include "tool/decode/DecodeSource.h"
@@ -14,8 +14,8 @@ struct DecodeJob {
 
 struct DecodeOptions {
     DecodeWishes wishes;
-    bool force = false;   // replace a file that exists
-    bool conceal = false; // take silence where the file is damaged
+    bool force = false;   // replaces a file that exists
+    bool conceal = false; // accepts silence where the file is damaged
     bool quiet = false;
     bool showsProgress = false;
 };
@@ -23,14 +23,14 @@ struct DecodeOptions {
 struct DecodeResult {
     std::string output;
     std::string container; // as DecodeFrame::container
-    DecodedSound sound;    // with the frames that were written
+    DecodedSound sound;    // with the number of frames written
     std::int64_t clippedSamples = 0;
     std::uint64_t missingFrames = 0; // as DecodeSource::missingFrames
     CarriedTags tags;
     std::vector<std::string> kept = {};  // as KeptMetadata::names
-    std::vector<std::string> notes = {}; // what is not as people may expect, in words
+    std::vector<std::string> notes = {}; // remarks for people about unexpected results
 };
 
-/// Either the output is written whole, or what had its name is as it was. Throws Failure. With standard output gone,
-/// ends and leaves it to that to say so.
+/// Either the output is complete, or what had its name is unchanged. Throws Failure. If standard output is gone, ends
+/// without one, because that stream reports it.
 DecodeResult decodeFile(const DecodeJob& job, const DecodeOptions& options);

@@ -56,7 +56,7 @@ std::string depthText(SampleDepth depth)
 
 platform::StreamDescription streamOf(const DecodedSound& sound, const DecodeFormat& format)
 {
-    // Of 8 bits the order says whether they are signed.
+    // For 8-bit samples the byte order determines their sign.
     const bool isBig = format.fileType == kAIFF || (format.fileType == kCaff && sound.depth.bits == 8);
     return platform::StreamDescription::packedPCM(sound.sampleRate, sound.channels,
                                                   {.bits = sound.depth.bits,

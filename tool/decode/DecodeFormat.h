@@ -1,4 +1,4 @@
-// What `ktfiles decode` writes: linear PCM in a WAVE, AIFF or CAF file, or bare.
+// The outputs of `ktfiles decode`: linear PCM in a WAVE, AIFF or CAF file, or raw.
 #pragma once
 
 #include "audiofile/AudioFileInfo.h"
@@ -11,17 +11,17 @@
 
 struct DecodeFormat {
     const char* name; // on the command line; the extension of new files
-    FourCC fileType;  // 0: bare samples, as in WAVE
+    FourCC fileType;  // 0: raw samples, as in WAVE
 };
 
-/// All of them; the first is the usual one.
+/// All formats; the first is the default.
 std::span<const DecodeFormat> decodeFormats();
 /// Null for an unknown name.
 const DecodeFormat* decodeFormatNamed(std::string_view name);
-/// The format that the extension of a file name means; the usual one for a name without extension, null for another.
+/// The format of a file name's extension; the default without an extension, null for an unknown one.
 const DecodeFormat* decodeFormatOf(const std::string& path);
 
-/// How deep samples are: 8, 16, 24 or 32 bits, floats 32 or 64.
+/// Sample depth: 8, 16, 24 or 32 bits; floats have 32 or 64.
 struct SampleDepth {
     int bits = 16;
     bool isFloat = false;
@@ -41,18 +41,18 @@ struct DecodedSound {
     std::int64_t bytes() const { return frames * bytesPerFrame(); }
 };
 
-/// How the sound's samples stand in a file of the format.
+/// How a file of the format stores the samples.
 platform::StreamDescription streamOf(const DecodedSound& sound, const DecodeFormat& format);
 
-/// What lies ahead of the samples and behind them. Made for a number of frames that is known from the start, so that
-/// the output need not be gone back to; when fewer came after all, `of` them is as long.
+/// What precedes and follows the samples. Made for a number of frames that is known in advance, so that the output need
+/// not be rewound; `of` a smaller number is equally long.
 class DecodeFrame {
 public:
-    /// `chunks` go ahead of the samples, whole. Throws Failure when the format cannot hold such a sound.
+    /// `chunks` are complete and precede the samples. Throws Failure if the format cannot hold the sound.
     DecodeFrame(const DecodedSound& sound, const DecodeFormat& format, Bytes chunks = {});
 
     std::string header(std::int64_t frames) const;
-    /// A pad byte where the container wants one.
+    /// A pad byte if the container needs one.
     std::string trailer(std::int64_t frames) const;
     /// "WAVE", "RF64", "AIFF", "AIFC", "CAF" or "raw".
     std::string container() const;
@@ -61,5 +61,5 @@ private:
     DecodedSound sound_;
     FourCC fileType_;
     Bytes chunks_;
-    bool reservesRoom_ = false; // to be RF64, which a WAVE file of more than 4 GiB is
+    bool reservesRoom_ = false; // for RF64, which a WAVE file above 4 GiB becomes
 };

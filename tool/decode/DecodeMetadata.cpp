@@ -24,7 +24,7 @@ constexpr std::array kOfWAVE{kBext, kIXML, kAxml, kChna, kCue, kList, kDigest};
 constexpr std::array kOfAIFF{kMark, kComments, fourCC("NAME"), fourCC("AUTH"), fourCC("(c) "), kRemark};
 constexpr std::array kOfCAF{kCAFInfo, kCAFMarkers, kCAFTexts};
 constexpr std::array<std::string_view, 7> kOfTexts{"INFO", "info", "NAME", "AUTH", "(c)", "ANNO", "COMT"};
-/// More than people write; all of them are held in memory.
+/// More than people write; all of it is held in memory.
 constexpr std::int64_t kMostBytes = 256 << 20;
 
 FourCC formOf(const HeldChunk& chunk)
@@ -119,7 +119,7 @@ std::span<const FourCC> DecodeMetadata::chunksOf(Family family)
     }
 }
 
-/// One output in the making.
+/// The metadata of one output while it is made.
 class DecodeMetadata::Keeper {
 public:
     Keeper(const DecodeMetadata& source, FourCC fileType, const BroadcastChange& changed, FollowingTags following)
@@ -165,10 +165,10 @@ private:
     }
     void told(FourCC sourceId) { kept_.sourceIds.push_back(sourceId); }
 
-    /// To a file of the same kind: the same chunks in their order.
+    /// For a file of the same kind: the same chunks in the same order.
     void copy()
     {
-        // Labels of points that are gone go too, wherever they stand.
+        // Labels of dropped points are dropped too, wherever they stand.
         std::vector<Bytes> cues;
         for (const HeldChunk& chunk : source_.chunks_)
             if (chunk.id == kCue && source_.family_ == Family::wave)
@@ -203,7 +203,7 @@ private:
             std::erase(kept_.sourceIds, kList);
     }
 
-    /// Of another part, or of other channels, an ADM document is not true.
+    /// An ADM document does not describe another part or other channels.
     void copyADM(const HeldChunk& chunk)
     {
         if (!change().isWhole || !changed_.keepsChannels)
@@ -214,7 +214,7 @@ private:
             kept_.notKept.emplace_back("axml still has the sample rates and bit depths of the file");
     }
 
-    /// Of the same bytes it is true.
+    /// A digest remains valid only for the same bytes.
     void copyDigest(const HeldChunk& chunk)
     {
         if (change().isWhole && !changed_.isRecoded && source_.order_ == std::endian::little)
@@ -250,7 +250,7 @@ private:
             keep(kCAFInfo, {kCAFInfo, std::move(*info)});
     }
 
-    /// To a file of another kind: what that has a place for.
+    /// For a file of another kind: everything that it has a place for.
     void translate()
     {
         PortableTexts texts;
@@ -261,7 +261,7 @@ private:
             readAIFF(texts, markers);
         else
             readCAF(texts, markers);
-        if (following_.genre && fileType_ == kAIFF) // among its texts there is no place for one
+        if (following_.genre && fileType_ == kAIFF) // AIFF's texts have no place for a genre
             std::erase_if(texts.texts, [](const auto& each) { return each.first == "genre"; });
         keepTexts(0, texts);
         dropped_ += markers.move(change());
@@ -295,7 +295,7 @@ private:
             told(kList);
     }
 
-    /// The loop's tags bring comments that take the place of remarks.
+    /// The loop's tags bring comments, which replace remarks.
     void readAIFF(PortableTexts& texts, PortableMarkers& markers)
     {
         PortableTexts comments;

@@ -1,5 +1,4 @@
-// What a decoded file keeps of what stands beside the sound in its source: who recorded it and when, texts, markers,
-// ADM.
+// The metadata that a decoded file keeps from its source: who recorded it and when, texts, markers, ADM.
 #pragma once
 
 #include "media/containers/ContainerTraits.h"
@@ -11,25 +10,25 @@
 #include <vector>
 
 struct KeptMetadata {
-    Bytes chunks;                     // for the header of the output, whole
-    std::vector<std::string> names;   // of these: chunks, of lists their forms
-    bool hasTexts = false;            // about the file
-    std::vector<FourCC> sourceIds;    // chunks of the source of which nothing is left to tell
-    std::vector<std::string> notKept; // what of others was left, in words
+    Bytes chunks;                     // complete, for the output's header
+    std::vector<std::string> names;   // of these chunks; of lists their forms
+    bool hasTexts = false;            // there are texts about the file
+    std::vector<FourCC> sourceIds;    // chunks of the source with nothing left to report
+    std::vector<std::string> notKept; // what was dropped from others, in words
 };
 
-/// What the loop's tags bring into the output.
+/// What the loop's tags will add to the output.
 struct FollowingTags {
     bool texts = false; // title, artist, copyright and comments
     bool genre = false;
 };
 
-/// Reads the chunks of the source while that may be read; one that has none gives nothing.
+/// Reads the chunks of the source while it may be read; a source without chunks yields nothing.
 class DecodeMetadata {
 public:
     explicit DecodeMetadata(const std::string& path);
 
-    /// For an output of the type, 0 for bare samples.
+    /// For an output of the type, 0 for raw samples.
     KeptMetadata keptIn(FourCC fileType, SoundChange change, const DecodedSound& sound, FollowingTags following) const;
 
 private:
@@ -37,12 +36,12 @@ private:
     class Keeper;
 
     static Family familyOf(platform::ContainerKind kind);
-    static std::span<const FourCC> chunksOf(Family family); // that are looked at
+    static std::span<const FourCC> chunksOf(Family family); // that are examined
 
     Family family_ = Family::none;
     std::endian order_ = std::endian::little;
     std::vector<HeldChunk> chunks_;
-    std::vector<FourCC> lost_;    // of those that are not all there, or too long
+    std::vector<FourCC> lost_;    // of chunks that are incomplete or too long
     int bits_ = 0, channels_ = 0; // of the source
     bool isFloat_ = false, isLinearPCM_ = false;
 };

@@ -19,7 +19,7 @@ std::string soundText(const DecodeResult& result)
                        depthText(sound.depth), channels);
 }
 
-/// What was carried over.
+/// Lists what was carried over.
 std::string withText(const DecodeResult& result)
 {
     std::vector<std::string> parts = result.kept;
@@ -63,7 +63,7 @@ void DecodeReport::add(const std::string& path, const DecodeResult& result)
         output_.print("{}: decoded to {}, {}{}\n", printable(path), printable(result.output), soundText(result),
                       withText(result));
     if (form_ == Form::table)
-        output_.flush(); // the next file may take its time
+        output_.flush(); // the next file may take a while
     if (quiet_ || result.notes.empty())
         return;
     output_.flush();

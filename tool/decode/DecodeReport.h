@@ -1,4 +1,4 @@
-// What `ktfiles decode` prints of each file that it wrote.
+// Prints what `ktfiles decode` has written, file by file.
 #pragma once
 
 #include "tool/decode/DecodeFile.h"

@@ -21,7 +21,7 @@ using platform::StreamDescription;
 namespace {
 
 constexpr std::int64_t kBlockFrames = 64 * 1024;
-constexpr std::int64_t kBlockBytes = 1 << 20; // of many channels fewer frames make a block
+constexpr std::int64_t kBlockBytes = 1 << 20; // with many channels a block has fewer frames
 constexpr double kMostFrames = 9e18;
 
 std::int64_t countBeyondFullScale(const float* samples, std::size_t count)
@@ -54,7 +54,7 @@ void DecodeSource::open(const std::string& path)
     platform::Error error;
     reader_ = ConvertingReader::open(*fileLocation(path), &status, &error);
     if (!reader_) {
-        CAudioFileIO file; // which says best what is wrong with it
+        CAudioFileIO file; // knows best what is wrong with it
         openAudio(file, path);
         requireDecoder(file);
         throw OtherKind(error.description, OtherKind::Kind::unknown);
@@ -71,7 +71,7 @@ void DecodeSource::setFormats(const DecodeWishes& wishes)
     sound_.channels = wishes.channels.value_or(own.channelsPerFrame);
     sound_.depth = wishes.depth.value_or(SampleDepth{sample.bits, sample.isFloat});
     stream_ = streamOf(sound_, *wishes.format);
-    // Where samples may lie beyond full scale they come as floats, to be counted.
+    // Samples that may exceed full scale are read as floats, so that they can be counted.
     const bool mayClip = !sound_.depth.isFloat && (sample.isFloat || sound_.sampleRate != own.sampleRate);
     StreamDescription client = stream_;
     if (mayClip)
@@ -89,7 +89,7 @@ void DecodeSource::setFormats(const DecodeWishes& wishes)
                                      std::round(sound_.sampleRate)));
 }
 
-// Which speakers the channels feed, and what only containers of linear PCM tell.
+// Reads which speakers the channels feed, and facts that only containers of linear PCM state.
 void DecodeSource::lookInto(const std::string& path)
 {
     if (reader_->fileFormat().channelsPerFrame == sound_.channels)
@@ -126,8 +126,8 @@ std::string_view DecodeSource::read()
     const bool clips = !floats_.empty();
     void* const to = clips ? static_cast<void*>(floats_.data()) : block_.data();
     auto wanted = static_cast<std::uint32_t>(std::min<std::int64_t>(left_, blockFrames_));
-    // A damaged file may end ahead of what it promises; a read across its end gives nothing, a shorter one what is
-    // there.
+    // A damaged file may end before the length that it promises. A read across its end fails, a shorter one returns
+    // what there is.
     std::uint32_t frames = 0;
     while (wanted > 0 && (frames = readFrames(to, wanted)) == 0)
         wanted /= 2;

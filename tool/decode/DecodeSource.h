@@ -1,4 +1,4 @@
-// An audio file of any format as the sound that `ktfiles decode` was asked for.
+// An audio file of any format, read as the sound that `ktfiles decode` was asked for.
 #pragma once
 
 #include "media/decoding/ConvertingReader.h"
@@ -13,13 +13,13 @@
 #include <string_view>
 #include <vector>
 
-/// What is asked for; what is not stays as the file has it.
+/// The requested properties; others stay as in the file.
 struct DecodeWishes {
     const DecodeFormat* format = nullptr;
     std::optional<double> sampleRate;
     std::optional<std::uint32_t> channels;
     std::optional<SampleDepth> depth;
-    // Of the output; of `end` and `frames` one at most.
+    // In output terms; at most one of `end` and `frames`.
     SoundLength start;
     std::optional<SoundLength> end, frames;
 };
@@ -29,24 +29,24 @@ class DecodeSource {
 public:
     DecodeSource(const std::string& path, const DecodeWishes& wishes);
 
-    /// Of the output, which has as many frames unless the file ends ahead of what it promises.
+    /// The output's sound. It has that many frames unless the file ends before the length that it promises.
     const DecodedSound& sound() const { return sound_; }
     bool isWhole() const { return isWhole_; }
-    /// Of FILE's frames at the output's rate, the first of the output.
+    /// Position in FILE, at the output's rate, of the output's first frame.
     std::uint64_t start() const { return start_; }
-    /// How many frames become one second, there and here.
+    /// Frames per second of the source.
     double sourceRate() const { return sourceRate_; }
-    /// What is not as it was asked for, in words.
+    /// Deviations from the request, in words.
     const std::vector<std::string>& notes() const { return notes_; }
 
-    /// The next samples, as a file of the format holds them; none at the end.
+    /// The next samples in the output's format; empty at the end.
     std::string_view read();
-    /// Samples so far that were beyond full scale, and stand at it now.
+    /// Samples so far that exceeded full scale and were clipped.
     std::int64_t clippedSamples() const { return clipped_; }
 
-    /// Of FILE's frames that were read, those that could not be decoded: silence stands for them.
+    /// Frames of FILE read so far that could not be decoded and are silence.
     std::uint64_t missingFrames() const { return reader_->missingFrames(); }
-    /// All of it was read, and it is not what FILE's checksum says.
+    /// Whether everything was read and contradicts FILE's checksum.
     bool isOtherThanItsChecksum() const { return reader_->checksum() == platform::ConvertingReader::Checksum::differs; }
 
 private:

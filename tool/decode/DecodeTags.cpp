@@ -18,10 +18,10 @@
 
 namespace {
 
-// Room that other programs leave, and what can be made from the sound again.
+// Padding, and data that can be computed again from the sound.
 constexpr FourCC kOfNoUse[] = {fourCC("junk"), fourCC("PAD "), fourCC("FLLR"), fourCC("PEAK"),
                                fourCC("peak"), fourCC("LGWV"), fourCC("ovvw"), fourCC("ovwf")};
-// Loop tags, in files that can hold some. "uuid" and "info" of CAF are looked into.
+// Chunks with loop tags, in files that can hold some. CAF's "uuid" and "info" are examined.
 constexpr FourCC kOfTags[] = {tagging::kBasicTagging,  tagging::kCategories,
                               tagging::kTransients,    tagging::kChannelStrip0,
                               tagging::kChannelStrip1, tagging::kChannelStrip2,
@@ -74,7 +74,7 @@ bool hasOtherUUIDs(const std::string& path)
     return false;
 }
 
-// Each once, in the order of the file.
+// Each id once, in file order.
 std::vector<std::string> otherChunks(const std::string& path, bool holdsTags)
 {
     std::vector<std::string> others;
@@ -104,7 +104,7 @@ std::string inWords(const std::vector<std::string>& chunks)
     return fmt::format("{} {} not carried over", text, chunks.size() == 1 ? "is" : "are");
 }
 
-// Texts and markers go another way, from whatever holds them.
+// Texts and markers are carried over separately, from any source.
 void leaveTexts(LoopSource& source)
 {
     source.tags.info.clear();
@@ -134,10 +134,10 @@ DecodeTags::DecodeTags(const std::string& path)
             failForTags(path, error);
     } catch (const OtherKind&) {
         holdsTags = false;
-    } catch (const Failure& failure) { // no reason to go without the sound
+    } catch (const Failure& failure) { // no reason to give up the sound
         problem_ = failure.what();
     }
-    if (source_ && source_->tags.fileType != source_->bytes.fileType) { // the chunks of samplers
+    if (source_ && source_->tags.fileType != source_->bytes.fileType) { // made from sampler chunks
         leaveTexts(*source_);
         others_ = otherChunks(path, false);
         return;
@@ -213,13 +213,13 @@ CarriedTags DecodeTags::carryTo(const std::string& output, const std::string& co
         for (const LoopTagChange& change : plan->changes)
             carried.keys.push_back(change.key);
         carried.notKept.insert(carried.notKept.end(), plan->notKept.begin(), plan->notKept.end());
-    } catch (const Failure& failure) { // nor a reason to lose it
+    } catch (const Failure& failure) { // no reason to give up the output
         carried.notKept.push_back(std::string("its tags are not carried over: ") + failure.what());
     }
     return carried;
 }
 
-// AIFF and CAF files hold tags of loops: the root note of a sampler alone would make one of any sound.
+// AIFF and CAF files hold tags of loops only: the root note of a sampler would turn any sound into a loop.
 void DecodeTags::leaveWhatMakesNoLoop(const std::string& container)
 {
     const bool isOfSamplers = source_ && source_->tags.fileType != source_->bytes.fileType;

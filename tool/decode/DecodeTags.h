@@ -1,4 +1,4 @@
-// The loop tags of a file that is decoded, and what else it holds beside the sound.
+// Carries over the loop tags of a decoded file, and lists what else it holds beside the sound.
 #pragma once
 
 #include "loops/tags/LoopTagsCopy.h"
@@ -9,29 +9,29 @@
 #include <string>
 #include <vector>
 
-/// What became of them, in words.
+/// The outcome, in words.
 struct CarriedTags {
-    std::vector<std::string> keys;    // as they are called in JSON; empty when there are none
-    std::vector<std::string> notKept; // why some or all are missing
+    std::vector<std::string> keys;    // as named in JSON; empty if there are none
+    std::vector<std::string> notKept; // reasons why tags are missing
 };
 
-/// Reads them while the file may be read.
+/// Reads the tags while the file may be read.
 class DecodeTags {
 public:
     explicit DecodeTags(const std::string& path);
 
-    /// That chunks of these ids are not told of: others carry them over.
+    /// Chunks with these ids are not listed, because others carry them over.
     void forget(std::span<const FourCC> ids);
-    /// The same of texts about the file, when it is no loop.
+    /// Texts about the file are not listed either, if it is no loop.
     void forgetTexts();
-    /// Whether carryTo will put the texts about the file (title, artist and so on) into the output.
+    /// Whether carryTo will write the texts about the file (title, artist and so on) to the output.
     bool carriesTexts(const std::string& container, bool isWhole) const;
-    /// The same of the genre, which of a loop is one of its tags.
+    /// As above for the genre, which is a tag of a loop.
     bool carriesGenre(const std::string& container, bool isWhole) const;
 
-    /// Puts them into the decoded file, the transients at the frames that they have at another rate; `isWhole` tells
-    /// whether all of the sound is there, for what the tags say is true of all of it only. An empty path stands for an
-    /// output that cannot be gone back to.
+    /// Writes the tags to the decoded file, transients at their frames at the new rate. `isWhole` says whether all of
+    /// the sound is there; some tags are true only of all of it. An empty path stands for an output that cannot be
+    /// rewound.
     CarriedTags carryTo(const std::string& output, const std::string& container, const DecodedSound& sound,
                         double sourceRate, bool isWhole);
 
@@ -39,7 +39,7 @@ private:
     void leaveWhatMakesNoLoop(const std::string& container);
     void scaleTransients(double factor);
 
-    std::shared_ptr<LoopSource> source_; // null: no tags
-    std::vector<std::string> others_;    // chunks that are neither tags nor sound, nor made from the sound
-    std::string problem_;                // why they could not be read
+    std::shared_ptr<LoopSource> source_; // null if there are no tags
+    std::vector<std::string> others_;    // chunks that are neither tags nor sound nor derived from it
+    std::string problem_;                // why the tags could not be read
 };

@@ -14,7 +14,7 @@
 
 namespace {
 
-// By the suite's rule of what an extension is: the number of a take is none.
+// Follows the suite's rule for extensions, by which a take number is none.
 std::string outputName(const std::string& name, const DecodeFormat& format)
 {
     std::string stem = name;
@@ -74,7 +74,7 @@ std::vector<FoundFile> DecodeTargets::plan(const std::vector<std::string>& names
     FolderWalk walk(names, [&](FoundFile file) {
         if (isEarlierOutput(file))
             return true;
-        // What only lies beside the sound, such as a picture, is passed over when its turn comes.
+        // Other files beside the sound, such as pictures, are skipped when their turn comes.
         if (toFolder_ && file.problem.empty() && (!file.isBelowFolder() || isCalledAudio(file.path))) {
             const std::string output = nameOf(file);
             if (const auto [other, isFirst] = sources.try_emplace(output, file.path); !isFirst) {

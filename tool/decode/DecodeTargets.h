@@ -1,4 +1,4 @@
-// Where the outputs of `ktfiles decode` go.
+// Chooses the outputs of `ktfiles decode`.
 #pragma once
 
 #include "tool/decode/DecodeFormat.h"
@@ -10,25 +10,24 @@
 #include <string>
 #include <vector>
 
-/// Whether `out` names a folder, and not a file: it is one, or ends with "/".
+/// Whether `out` names a folder: it is one, or ends with "/".
 bool isDecodeFolder(const std::string& out);
 
-/// The outputs of many files: which they are, and the folders that they are in, made where they are missing and gone
-/// again when nothing came to be in them.
+/// The outputs of many files and their folders, which are created if missing and removed again if they stay empty.
 class DecodeTargets {
 public:
-    /// `out` is empty (the current folder), "-", a folder, or the file to write. In a folder an output is called as
-    /// what it comes from, with the extension of the format, and the tree below a folder that was named is mirrored.
+    /// `out` is empty (the current folder), "-", a folder, or the output file. In a folder an output has the name of
+    /// its source with the format's extension, and the tree below a named folder is mirrored.
     DecodeTargets(const std::string& out, const DecodeFormat& format);
     ~DecodeTargets();
     DecodeTargets(const DecodeTargets&) = delete;
     DecodeTargets& operator=(const DecodeTargets&) = delete;
 
-    /// The files that these names lead to, without those in the output folder, where earlier outputs are. What would be
-    /// decoded to one output with another is told on standard error.
+    /// The files that these names lead to, except those in the output folder, which are earlier outputs. Files that
+    /// would share an output are reported on standard error.
     std::vector<FoundFile> plan(const std::vector<std::string>& names);
 
-    /// The output of one of them; its folder is there. By any thread. Throws Failure.
+    /// The output of one file, whose folder exists then. May be called by any thread. Throws Failure.
     std::string outputOf(const FoundFile& file);
 
 private:
@@ -39,7 +38,7 @@ private:
     std::string out_;
     const DecodeFormat& format_;
     bool toFolder_;
-    std::set<std::string> shared_; // files that would be decoded to one output with others
+    std::set<std::string> shared_; // files that would share an output
     std::mutex mutex_;
-    std::vector<std::string> made_; // the mutex's
+    std::vector<std::string> made_; // guarded by the mutex
 };

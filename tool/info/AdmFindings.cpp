@@ -10,7 +10,7 @@
 
 namespace {
 
-/// Null when it was not read to its end; then `problem` says why.
+/// Null if the document was not read to its end; `problem` says why.
 std::unique_ptr<ADMDocument> readDocument(AdmSource& source, ADMDiagnostic& problem)
 {
     auto document = std::make_unique<ADMDocument>(nullptr);
@@ -20,7 +20,7 @@ std::unique_ptr<ADMDocument> readDocument(AdmSource& source, ADMDiagnostic& prob
     bool isComplete = false;
     try {
         isComplete = document->parseStream(*stream);
-    } catch (const ADMException&) { // the handler has heard of it
+    } catch (const ADMException&) { // the handler has received it
     }
     document->setDiagnosticsHandler(nullptr);
     if (const platform::Error* error = document->parseError();

@@ -1,4 +1,4 @@
-// What is off between the chunks "axml" and "chna" of a file.
+// Checks the chunks "axml" and "chna" of a file against each other.
 #pragma once
 
 #include "audiofile/CAudioFileIO.h"
@@ -7,18 +7,18 @@
 #include <string>
 #include <vector>
 
-/// Where they stand; with all of their bytes.
+/// Their positions; both are complete.
 struct AdmChunks {
     std::optional<ChunkEntry> document, tracks; // "axml" and "chna"
 };
 
 struct AdmFinding {
-    const char* name; // in JSON
+    const char* name; // as in JSON
     FourCC chunk;
     std::int64_t offset; // of the chunk's header
     std::string text;
-    const char* effect; // what readers do
+    const char* effect; // how readers react
 };
 
-/// Of a file that has one of them at least. That the document is ADM at all, `adm --check` tells. Throws Failure.
+/// For a file with at least one of them. Whether the document is ADM at all is left to `adm --check`. Throws Failure.
 std::vector<AdmFinding> admFindings(const std::string& path, const AdmChunks& chunks);

@@ -18,10 +18,10 @@ AudioFileInfo describeFile(const std::string& path, bool quiet)
     }
     if (status != kStatusOK || info.containerId == 0)
         failForSound(path, status);
-    if (info.framesAreStated) { // by a header: the decoder, where there is one, counts
+    if (info.framesAreStated) { // by a header: a decoder counts, if there is one
         CAudioFileIO audio;
         openAudio(audio, path);
-        if (audio.OpenDecoder() == kStatusIOError) // it is there, and nothing can be decoded
+        if (audio.OpenDecoder() == kStatusIOError) // a decoder exists, but nothing can be decoded
             failForSound(path, kStatusIOError);
         return audio.Info();
     }

@@ -1,4 +1,4 @@
-// What a file is, by whatever knows it: the library's own readers, and the decoder where only that can count.
+// Describes a file with the library's own readers, or with a decoder where only decoding can count.
 #pragma once
 
 #include "audiofile/AudioFileInfo.h"
@@ -9,5 +9,5 @@
 /// Throws Failure.
 AudioFileInfo describeFile(const std::string& path, bool quiet);
 
-/// What the headers promise, where that is more than there is; 0 where it cannot be told.
+/// The number of frames that the headers promise if it exceeds the real one; 0 if that is unknown.
 std::int64_t promisedFrames(const AudioFileInfo& info);

@@ -1,4 +1,4 @@
-// What is off in a container, in words.
+// Words for what is wrong in a container.
 #pragma once
 
 #include "media/containers/ContainerCheck.h"
@@ -6,9 +6,9 @@
 #include <string>
 
 struct FindingWords {
-    const char* name;   // in JSON
-    std::string text;   // what is off
-    const char* effect; // what readers do
+    const char* name;   // as in JSON
+    std::string text;   // what is wrong
+    const char* effect; // how readers react
 };
 
 FindingWords wordsOf(const platform::ContainerFinding& finding);

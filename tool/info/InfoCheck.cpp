@@ -13,15 +13,15 @@
 
 namespace {
 
-/// One thing that is off.
+/// One problem.
 struct Problem {
-    const char* name; // in JSON
+    const char* name; // as in JSON
     std::string text, effect;
     FourCC chunk = 0; // 0 in files without chunks
     std::uint64_t offset = 0;
 };
 
-/// Of what is compressed throughout only the length can be told.
+/// For compressed files only the length can be checked.
 std::vector<Problem> problemsOfSound(const std::string& path, bool quiet)
 {
     const AudioFileInfo info = describeFile(path, quiet);
@@ -33,7 +33,7 @@ std::vector<Problem> problemsOfSound(const std::string& path, bool quiet)
     return {{"soundIsCut", text, "readers take what is there"}};
 }
 
-/// Those that are cut are told by their sizes.
+/// Chunks that are cut short are reported by their sizes.
 AdmChunks wholeAdmChunks(CAudioFileIO& file)
 {
     AdmChunks chunks;
@@ -63,7 +63,7 @@ std::vector<Problem> problemsOf(const std::string& path, bool quiet)
         Progress progress("checking", file.Info().dataSize, quiet, path);
         if (status == kStatusOK)
             status = CheckStatedDigest(file, findings, [&] {
-                progress.advance(1 << 20); // it asks ahead of each MiB
+                progress.advance(1 << 20); // called before each MiB
                 return true;
             });
         for (const platform::ContainerFinding& finding : findings) {
@@ -122,7 +122,7 @@ private:
         json.endArray().endObject();
         jsonRecords().end();
     }
-    /// One for each finding; of a file in which all is well one that has the path alone.
+    /// One row per finding; a file without findings has a row with its path alone.
     void addRows(const std::string& path, const std::vector<Problem>& problems)
     {
         const Record file = Record().member("path", path);

@@ -1,4 +1,4 @@
-// ktfiles info: what audio files are.
+// ktfiles info: describes audio files.
 #include "audiofile/AudioDigest.h"
 #include "platform/core/HexText.h"
 #include "tool/info/FileDescription.h"
@@ -53,7 +53,7 @@ std::string lengthText(const AudioFileInfo& info)
     return fmt::format("{} of {}", there, durationText(static_cast<double>(promised) / info.exactSampleRate));
 }
 
-/// Of compressed sound, bits per second; 0 where it cannot be told, as of one track of several.
+/// Bits per second of compressed sound; 0 if unknown, as for one track of several.
 std::int64_t bitRateOf(const AudioFileInfo& info)
 {
     if (info.audioTracks > 1)
@@ -68,20 +68,20 @@ std::string typeByNameText(const FileFacts& facts)
     return facts.typeByName != 0 ? fourCCText(facts.typeByName) : "";
 }
 
-/// What is asked for beside the description itself.
+/// What is requested beside the description.
 struct InfoOptions {
     bool isLong = false, isCheck = false, wantsMD5 = false, wantsSHA256 = false;
     unsigned threads = 0;
 };
 
-/// What is known of a file.
+/// What is known about a file.
 struct Description {
     AudioFileInfo info;
     FileFacts facts;
-    std::string md5, sha256; // of the sound, in hexadecimal; empty where there is none
+    std::string md5, sha256; // of the sound, in hexadecimal; empty if there is none
 };
 
-/// Of what is compressed throughout nobody keeps one but FLAC, which states its own.
+/// Adds digests. Compressed files have none except FLAC, which states its own.
 void addDigests(Description& description, const std::string& path, const InfoOptions& wanted, bool quiet)
 {
     using platform::Digest;
@@ -190,7 +190,7 @@ std::vector<Table::Column> columns(const InfoOptions& wanted)
         {.title = "FILE", .isCuttable = true},        {.title = "TYPE", .dropRank = 5},
         {.title = "DURATION", .align = Align::right}, {.title = "RATE", .align = Align::right, .dropRank = 7},
         {.title = "FORMAT", .dropRank = 6},           {.title = "CHANNELS", .dropRank = wanted.isLong ? 4 : 8}};
-    if (wanted.isLong) // what was asked for is left out last
+    if (wanted.isLong) // what was requested is dropped last
         titles.insert(titles.end(), {{.title = "BY NAME", .dropRank = 3},
                                      {.title = "MODIFIED", .dropRank = 1},
                                      {.title = "STEREO PARTNER", .dropRank = 2, .isCuttable = true}});
@@ -201,7 +201,7 @@ std::vector<Table::Column> columns(const InfoOptions& wanted)
     return titles;
 }
 
-// Writes the descriptions in one of the forms, each as soon as it is known where the form allows that.
+// Writes descriptions in one of the forms, each as soon as the form allows.
 class InfoWriter {
 public:
     InfoWriter(const OutputOptions& options, const InfoOptions& wanted)

@@ -15,14 +15,15 @@ namespace {
 constexpr std::array kForwardedSignals{SIGHUP, SIGINT, SIGQUIT, SIGTERM, SIGUSR1, SIGUSR2};
 enum : int { kExitCannotRun = 126, kExitNotFound = 127, kExitSignal = 128 };
 
-/// Keeps the signals of interest for sigwaitinfo, for as long as it lives.
+/// Blocks the signals of interest for sigwaitinfo during its lifetime.
 class HeldSignals {
 public:
     HeldSignals()
     {
         struct sigaction byDefault = {};
         byDefault.sa_handler = SIG_DFL;
-        ::sigaction(SIGCHLD, &byDefault, &childAction_); // ignored, it would cost us the exit status
+        // If SIGCHLD were ignored, the exit status would be lost.
+        ::sigaction(SIGCHLD, &byDefault, &childAction_);
         sigemptyset(&held_);
         sigaddset(&held_, SIGCHLD);
         for (const int signal : kForwardedSignals)
@@ -51,7 +52,7 @@ int spawn(const std::vector<std::string>& words, const sigset_t& mask, pid_t& ch
     for (const std::string& word : words)
         arguments.push_back(const_cast<char*>(word.c_str()));
     arguments.push_back(nullptr);
-    sigset_t ours; // what `main` ignores for its own sake
+    sigset_t ours; // without what `main` ignores for itself
     sigemptyset(&ours);
     sigaddset(&ours, SIGXFSZ);
     posix_spawnattr_t attributes;

@@ -9,13 +9,14 @@ namespace {
 
 namespace fs = std::filesystem;
 
-// What the kernel adds to the name of a file that was replaced or removed; the item is the path's, whatever is there.
+// The kernel appends this to the name of a file that was replaced or removed; the item is the path's, whatever is
+// there.
 constexpr std::string_view kDeleted = " (deleted)";
 
 std::set<std::string> openPaths(int process)
 {
     std::set<std::string> paths;
-    std::error_code ended; // processes end while they are looked at
+    std::error_code ended; // processes may end meanwhile
     for (fs::directory_iterator one("/proc/" + std::to_string(process) + "/fd", ended), end; !ended && one != end;
          one.increment(ended)) {
         std::error_code closed;

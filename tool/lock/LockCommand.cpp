@@ -1,4 +1,4 @@
-// ktfiles lock: holds others back from a file while a command runs, or until the end of the input.
+// ktfiles lock: keeps others away from a file while a command runs, or until the end of the input.
 #include "coordination/KTFileCoordinationLock.h"
 #include "coordination/KTFilePresenterLock.h"
 #include "platform/Log.h"
@@ -34,11 +34,11 @@ struct LockArguments {
     bool read = false, write = false, presenter = false;
     std::optional<double> timeout; // seconds
 
-    bool isWriting() const { return !read; } // acquiring a presenter lock takes a coordinated write
+    bool isWriting() const { return !read; } // acquiring a presenter lock is a coordinated write
     const char* kind() const { return read ? "read" : presenter ? "presenter" : "write"; }
 };
 
-/// A lock that says why it could not be had: the library tells that to the log alone.
+/// Captures the reason for a refused lock, which the library tells to the log only.
 class RefusalLog {
 public:
     RefusalLog() { platform::setLogHandler(keep); }
@@ -58,7 +58,7 @@ private:
         const std::lock_guard guard(mutex());
         line() = text;
     }
-    // Never destroyed: a thread of the library may still speak while the process exits.
+    // Never destroyed: a thread of the library may log while the process exits.
     static std::mutex& mutex()
     {
         static auto& object = *new std::mutex;
@@ -71,7 +71,7 @@ private:
     }
 };
 
-/// The one holder of a lock that is in no table; lets go of it when it is destroyed.
+/// The only holder of a lock that is in no table; releases it on destruction.
 class Holder {
 public:
     Holder(const LockArguments& arguments, const platform::URLRef& url)
@@ -88,7 +88,7 @@ public:
     Holder& operator=(const Holder&) = delete;
 
     bool isHadBy(Clock::time_point time) const { return held_.wait_until(time) == std::future_status::ready; }
-    /// Waits without limit; throws Failure when the system refuses.
+    /// Waits without limit; throws Failure if the system refuses.
     void await()
     {
         try {
@@ -102,7 +102,7 @@ private:
     template <class Lock>
     void retain(std::shared_ptr<Lock> lock)
     {
-        // A lock that fails drops the handler, and with it the promise.
+        // A lock that fails drops the handler and the promise with it.
         const auto promise = std::make_shared<std::promise<void>>();
         held_ = promise->get_future();
         lock_ = lock;
@@ -148,7 +148,7 @@ void sayHeld(const LockArguments& arguments, const OutputOptions& options)
     case Form::lines:
         output.print("{}\t{}\theld\n", printable(shownName(arguments.file)), arguments.kind());
         break;
-    case Form::csv: // which this verb has not
+    case Form::csv: // this verb has no CSV
     case Form::none:
         break;
     }
@@ -164,16 +164,16 @@ void awaitEndOfInput()
     while (got > 0 || (got < 0 && errno == EINTR));
 }
 
-/// The exit status.
+/// Returns the exit status.
 int lockAndRun(const LockArguments& arguments, const OutputOptions& options)
 {
     const platform::URLRef url = fileLocation(arguments.file);
-    // Not taken for had: two commands under that lock, each with one of its own, would meet. Nor for reading: a writer
-    // that waits in between would hold back what it waits for.
+    // Refused rather than taken for held: two commands below that lock, each with a lock of its own, would not exclude
+    // each other. Reading is refused too, since a writer that waits in between would block the lock that it waits for.
     if (const auto lock = lockAbove(url))
         throw Failure(fmt::format("is locked by process {} already, which waits for this command; nothing was run",
                                   lock->processID));
-    // Nothing is read from it: `ktfiles locks` knows items by number alone, and finds the name of this one here.
+    // Nothing is read from it: `ktfiles locks` knows items by number only, and finds this one's name here.
     const platform::OwnedDescriptor shown(::open(arguments.file.c_str(), O_PATH | O_CLOEXEC));
     Holder holder(arguments, url);
     awaitLock(holder, arguments, url, options.quiet);

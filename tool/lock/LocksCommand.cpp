@@ -1,4 +1,4 @@
-// ktfiles locks: who presents, holds and waits for files.
+// ktfiles locks: lists who presents, holds and awaits files.
 #include "tool/lock/ItemNames.h"
 #include "tool/shared/access/FileAccess.h"
 #include "tool/shared/access/Parties.h"
@@ -33,7 +33,7 @@ public:
     {
     }
 
-    /// `path` is empty when only the item's number is known.
+    /// `path` is empty if only the item's number is known.
     void add(const std::string& path, const CoordinationParty& party)
     {
         const std::string name = processName(party.processID);

@@ -31,7 +31,7 @@ std::string head(const AudiowaveformSettings& settings, std::int32_t rate, std::
         return fmt::format("{{\"version\":{},\"channels\":{},\"sample_rate\":{},\"samples_per_pixel\":{},\"bits\":8,"
                            "\"length\":{},\"data\":[",
                            kVersion, channels, rate, settings.framesPerPoint, length);
-    // Little-endian; the last bit of the flags says that there are 8 bits and not 16.
+    // Little-endian; the lowest bit of the flags says 8 bits instead of 16.
     const std::array<std::uint32_t, 6> fields{kVersion,
                                               kEightBits,
                                               static_cast<std::uint32_t>(rate),

@@ -1,5 +1,5 @@
-// Waveform data in the formats of the open project audiowaveform, version 2, 8 bits, which its players read. Published
-// source: doc/DataFormat.md of that project.
+// Writes waveform data in the formats of the open project audiowaveform, version 2, 8 bits, which its players read.
+// Published source: doc/DataFormat.md of that project.
 #pragma once
 
 #include "tool/overview/SoundLanes.h"
@@ -14,17 +14,17 @@
 
 enum class AudiowaveformFormat { json, dat };
 
-/// The format that the name of an output means: ".dat" and ".json" in any case, "-" is JSON; none for another one.
+/// The format of an output's name: ".dat" and ".json" in any case, "-" for JSON; none for others.
 std::optional<AudiowaveformFormat> audiowaveformFormatOf(const std::string& out);
 
 struct AudiowaveformSettings {
     AudiowaveformFormat format = AudiowaveformFormat::json;
     std::int64_t from = 0, to = 0; // frames, within the sound
     std::int32_t framesPerPoint = 256;
-    std::vector<SoundLane> lanes; // a channel for each; of kind channel or sum
+    std::vector<SoundLane> lanes; // one per channel; of kind channel or sum
 };
 
-/// Reads the sound and writes its points to `sink`, a lowest and a highest sample for each lane of each, -128 to 127.
-/// Told how many frames are done since the last call. Throws Failure.
+/// Reads the sound and writes its points to `sink`: for each of them a lowest and a highest sample per lane, -128 to
+/// 127. The progress function receives the number of frames since its last call. Throws Failure.
 void writeAudiowaveform(SoundReader& sound, const AudiowaveformSettings& settings, const Sink& sink,
                         const std::function<void(std::int64_t frames)>& progress);

@@ -22,9 +22,9 @@ constexpr int kMostWidth = 32767, kMostHeight = 65535; // pixels
 constexpr int kGap = 12;                               // around and between cells
 constexpr int kNameStrip = 18;
 constexpr float kNameBaseline = 13;
-constexpr float kInset = 1; // strokes are as wide
+constexpr float kInset = 1; // as wide as strokes
 constexpr float kLineHeight = 14;
-constexpr double kShape = 1.6; // width to height, where nobody says how many columns
+constexpr double kShape = 1.6; // width to height, unless the number of columns is given
 
 std::string fitted(const std::string& text, float width)
 {
@@ -42,7 +42,7 @@ std::string fitted(const std::string& text, float width)
     return broadestWidth(result, kLabelHeight) <= width ? result : std::string();
 }
 
-// Broken between words; the last of `most` lines is cut.
+// Breaks between words; cuts the last of `most` lines.
 std::vector<std::string> lines(const std::string& text, float width, std::size_t most)
 {
     std::vector<std::string> lines;
@@ -62,7 +62,7 @@ std::vector<std::string> lines(const std::string& text, float width, std::size_t
     return lines;
 }
 
-/// Takes a text, its x and its baseline in the cell.
+/// Receives a text, its x and its baseline in the cell.
 using PutText = std::function<void(const std::string& text, float x, float baseline, Anchor anchor)>;
 
 void layOutTexts(const SheetCell& cell, const PictureSettings& settings, const PutText& put)
@@ -186,7 +186,7 @@ void ContactSheet::writeSVG(const PictureColors& colors, const Sink& sink) const
     const int next = columns();
     for (int i = 0; i < static_cast<int>(cells_.size()); ++i) {
         const SheetCell& cell = cells_[static_cast<std::size_t>(i)];
-        // An element of its own cuts off what another font makes too wide.
+        // A nested element clips text that another font makes too wide.
         std::string svg = fmt::format("<svg x=\"{}\" y=\"{}\" width=\"{}\" height=\"{}\">\n<title>{}</title>\n",
                                       i % next * cellWidth() + kGap, i / next * cellHeight() + kGap, settings_.width,
                                       settings_.height + kNameStrip, svgEscaped(shownName(cell.name)));

@@ -1,4 +1,4 @@
-// Pictures of many files on one sheet: a grid of cells, each with a name and a duration below its picture.
+// Pictures of many files on one sheet: a grid of cells, each with name and duration below its picture.
 #pragma once
 
 #include "tool/overview/PictureColors.h"
@@ -11,21 +11,21 @@
 
 enum class SheetFormat { png, svg };
 
-/// The format that the name of an output means: ".png" and ".svg" in any case; none for another one.
+/// The format of an output's name: ".png" and ".svg" in any case; none for others.
 std::optional<SheetFormat> sheetFormatOf(const std::string& out);
 
-/// What one file comes to: its picture, or the reason why there is none.
+/// The result for one file: its picture, or the reason why there is none.
 struct SheetCell {
-    std::string name;     // as the sheet shows it
-    std::string duration; // empty: not known
+    std::string name;     // as shown on the sheet
+    std::string duration; // empty if unknown
     std::optional<WaveformPicture> picture;
     std::string problem;
 };
 
-/// Keeps what is drawn of each file, some kilobytes; the pixels are made row by row of cells when the sheet is written.
+/// Keeps some kilobytes for each file; pixels are made row by row of cells while the sheet is written.
 class ContactSheet {
 public:
-    /// `settings` are those of each picture; without a number of columns the sheet gets the shape of a screen.
+    /// `settings` apply to each picture; without a number of columns the sheet has the shape of a screen.
     ContactSheet(const PictureSettings& settings, std::optional<int> columns) : settings_(settings), columns_(columns)
     {
     }
@@ -33,7 +33,7 @@ public:
     void add(SheetCell cell);
     std::size_t count() const { return count_; }
 
-    /// The size in pixels of the sheet with all that was added. Throws Failure where that is beyond what viewers take.
+    /// Size in pixels of the sheet with all pictures added. Throws Failure if that exceeds what viewers accept.
     struct Size {
         int width = 0, height = 0;
     };
@@ -52,5 +52,5 @@ private:
     PictureSettings settings_;
     std::optional<int> columns_;
     std::vector<SheetCell> cells_;
-    std::size_t count_ = 0; // also of those that are too many to be kept
+    std::size_t count_ = 0; // includes those that are too many to be kept
 };

@@ -16,7 +16,7 @@ bool isFinerThanOverviews(FrameRange range, const PictureSettings& settings)
     return range.to - range.from < columns * kOverviewFramesPerPoint;
 }
 
-// From where on samples have no room above them: integers of so many bits end one step below 1.
+// The level at which samples cannot go higher: integers of that many bits end one step below 1.
 float clippingOf(const AudioFileInfo& info)
 {
     if (info.compressed || info.floatingPoint || info.bitsPerSample <= 0)
@@ -24,7 +24,7 @@ float clippingOf(const AudioFileInfo& info)
     return 1 - std::ldexp(1.0F, 1 - std::min(info.sourceBits > 0 ? info.sourceBits : info.bitsPerSample, 24));
 }
 
-// What is no number is silence, and infinity has a place far beyond every picture.
+// A NaN is silence, and infinity is placed far beyond every picture.
 float sampleOf(const SoundLane& lane, const float* frame, int channels)
 {
     constexpr float kFarAway = 1e4F;
@@ -74,7 +74,7 @@ DrawnSound drawnSamples(SoundReader& sound, FrameRange range, const std::vector<
     SampleColumns columns(lanes, channels, drawn.from, length / frame.columns(),
                           static_cast<std::size_t>(frame.columns()));
     std::int64_t at = range.from;
-    // A line goes on to the sample behind the last one.
+    // A line continues to the sample after the last one.
     const std::int64_t end = asLine ? std::min(range.to + 1, sound.info().frames) : range.to;
     sound.read(range.from, end, [&](const float* samples, std::int64_t frames) {
         columns.add(samples, at, std::min(frames, range.to - at));
@@ -94,6 +94,6 @@ DrawnSound drawnSamples(SoundReader& sound, FrameRange range, const std::vector<
 bool suffices(const FileOverview& stored, ChannelChoice choice, FrameRange range, const PictureSettings& settings)
 {
     const bool isItsLane = choice.kind == ChannelChoice::Kind::overview || stored.info().channels == 1;
-    // Amplified, the steps of its 8 bits would show.
+    // Amplification would show the steps of its 8 bits.
     return isItsLane && settings.gain && *settings.gain <= 0 && !isFinerThanOverviews(range, settings);
 }

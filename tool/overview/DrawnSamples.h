@@ -1,4 +1,4 @@
-// What a picture shows of the samples of a file.
+// What a picture shows of a file's samples.
 #pragma once
 
 #include "tool/overview/FileOverview.h"
@@ -9,20 +9,19 @@
 #include <functional>
 #include <vector>
 
-/// The part of a sound that is asked for, in frames.
+/// The requested part of a sound, in frames.
 struct FrameRange {
     std::int64_t from = 0, to = 0;
 };
 
-/// The lanes of a picture of that part. Without a choice that is the overview's own lane, and where a picture is finer
-/// than overviews are, each channel by itself as long as there is room. Throws Failure for more lanes than there is
-/// room for.
+/// The lanes of a picture of that part. The default is the overview's own lane, or each channel by itself if the
+/// picture is finer than overviews are and there is room. Throws Failure if there is no room for the lanes.
 std::vector<SoundLane> lanesFor(ChannelChoice choice, const AudioFileInfo& info, FrameRange range,
                                 const PictureSettings& settings);
 
-/// Reads the frames of the part and no others. Told how many are done since the last call. Throws Failure.
+/// Reads only the frames of the part. The progress function receives the number since its last call. Throws Failure.
 DrawnSound drawnSamples(SoundReader& sound, FrameRange range, const std::vector<SoundLane>& lanes,
                         const PictureFrame& frame, const std::function<void(std::int64_t frames)>& progress);
 
-/// Whether the points of an overview are as fine as such a picture of that part.
+/// Whether an overview's points are fine enough for such a picture of that part.
 bool suffices(const FileOverview& stored, ChannelChoice choice, FrameRange range, const PictureSettings& settings);

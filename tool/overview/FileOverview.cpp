@@ -53,7 +53,7 @@ Waveform FileOverview::waveform() const
 {
     Waveform waveform;
     waveform.points = {OverviewPointsOf(*block_), OverviewPoints(*block_)};
-    // The header of a block counts no further than 32 bits.
+    // A block's header counts with 32 bits.
     const bool fits = OverviewPointCount(info_.frames) == static_cast<std::int64_t>(waveform.points.size());
     waveform.frames = fits ? info_.frames : OverviewFrames(*block_);
     waveform.sampleRate = sampleRateOf(info_);

@@ -1,4 +1,4 @@
-// The overview of one audio file: computed from its samples, or the one that is stored in it.
+// The overview of one audio file, computed from its samples or stored in it.
 #pragma once
 
 #include "platform/core/KTMem.h"
@@ -8,21 +8,21 @@
 #include <memory>
 #include <string>
 
-/// Owns the overview block. Throws Failure where a file has no overview.
+/// Owns the overview block. Throws Failure if a file has no overview.
 class FileOverview {
 public:
-    /// Without points.
+    /// Has no points.
     static FileOverview described(const SoundReader& sound);
-    /// Reads all samples, with a progress bar where that lasts and it is asked for.
+    /// Reads all samples; shows a progress bar if that is requested and reading takes long.
     static FileOverview computed(SoundReader& sound, bool showsProgress);
     static FileOverview stored(const std::string& path);
 
-    /// What people should know, when the file ends ahead of its sample data and the overview is of what is there.
+    /// A note if the file ends before its sample data does, so that the overview covers only a part.
     const std::string& note() const { return note_; }
 
-    /// The points, which there must be, for as long as this lives.
+    /// The points, which must exist; valid during the lifetime of this object.
     Waveform waveform() const;
-    /// For people.
+    /// In words.
     std::string duration() const;
     KTMem& block() { return *block_; }
     const AudioFileInfo& info() const { return info_; }

@@ -16,7 +16,7 @@ namespace {
 constexpr float kDigitHeight = 7;  // units
 constexpr float kLetterGap = 1.8F; // between letters
 constexpr float kStroke = 0.15F;   // of the digit height
-constexpr float kBeyond = 2.6F;    // what accents and descenders take above and below, units
+constexpr float kBeyond = 2.6F;    // height of accents and depth of descenders, in units
 
 struct Point {
     float x, y;
@@ -49,7 +49,7 @@ std::vector<PlacedGlyph> placed(std::string_view text)
     return glyphs;
 }
 
-// As straight pieces in pixels.
+// Converts it to straight segments in pixels.
 void addSegments(std::vector<Segment>& segments, const LabelStroke& stroke, Point origin, float scale)
 {
     const auto placed = [&](float x, float y) { return Point{origin.x + x * scale, origin.y + y * scale}; };

@@ -1,16 +1,15 @@
-// Texts in a PNG: thin strokes, drawn without any font of the system.
+// Texts in a PNG, drawn with thin strokes instead of a font of the system.
 #pragma once
 
 #include <string_view>
 
 class Raster;
 
-/// The width in pixels of `text`, which is UTF-8, at a digit height of `size` pixels. A character without a shape of
-/// its own is a box.
+/// The width in pixels of `text`, which is UTF-8, at a digit height of `size` pixels. Unknown characters are boxes.
 float labelWidth(std::string_view text, float size);
 
-/// The widest that the text comes out, here or in an SVG, where any sans-serif font may show it.
+/// The largest width of the text, here or in an SVG, which any sans-serif font may display.
 float broadestWidth(std::string_view text, float size);
 
-/// Draws it in the color of the axis, from `x` on, standing on `baseline`.
+/// Draws in the axis color from `x` on, on the line `baseline`.
 void drawLabel(Raster& raster, std::string_view text, float x, float baseline, float size);

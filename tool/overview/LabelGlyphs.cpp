@@ -27,7 +27,7 @@ constexpr LabelGlyph glyph(float width, Strokes... strokes)
     return {width, {strokes...}, sizeof...(strokes)};
 }
 
-// From the space to the tilde.
+// From space to tilde.
 constexpr std::array kASCII{
     glyph(0.6F),
     /* ! */ glyph(0.6F, line(0.3F, 0, 0.3F, 4.8F), dot(0.3F, 6.7F)),
@@ -156,7 +156,7 @@ constexpr LabelGlyph kEllipsis = glyph(3.8F, dot(0.3F, 6.7F), dot(1.9F, 6.7F), d
 constexpr LabelGlyph kSharpS = glyph(3.6F, line(0.1F, 7, 0.1F, 1.7F), arc(1.5F, 1.7F, 1.4F, 1.7F, 180, 400),
                                      arc(1.6F, 5.1F, 1.9F, 1.9F, 270, 480));
 
-// From U+00C0 on, a letter and its mark each.
+// From U+00C0 on: a letter and its mark.
 constexpr std::string_view kLatin = "A`A'A^A~A:Ao..C,E`E'E^E:I`I'I^I:..N~O`O'O^O~O:..O/U`U'U^U:Y'...."
                                     "a`a'a^a~a:ao..c,e`e'e^e:i`i'i^i:..n~o`o'o^o~o:..o/u`u'u^u:y'..y:";
 static_assert(kLatin.size() == 2 * (0x100 - 0xC0));

@@ -1,4 +1,4 @@
-// The shapes of the letters in a PNG: lines and arcs, in units of a seventh of a digit's height.
+// The shapes of letters in a PNG: lines and arcs, in units of a seventh of a digit's height.
 #pragma once
 
 #include <array>
@@ -7,8 +7,8 @@
 #include <span>
 #include <string_view>
 
-/// A line, or with `angles` an arc of an ellipse about (x, y) with radii (a, b), from and to degrees clockwise from the
-/// right. y grows downwards; digits and capitals reach from 0 to 7, where the baseline is.
+/// A line, or with `angles` an arc of an ellipse around (x, y) with radii (a, b), from and to degrees clockwise from
+/// the right. y grows downwards; digits and capitals extend from 0 to 7, the baseline.
 struct LabelStroke {
     float x, y, a, b; // line: from (x, y) to (a, b)
     std::optional<std::array<float, 2>> angles = {};
@@ -22,11 +22,11 @@ struct LabelGlyph {
     std::span<const LabelStroke> all() const { return std::span(strokes).first(count); }
 };
 
-/// The shape of a character: printable ASCII, Latin-1 letters, a few signs; of every other one a box. No shape for one
-/// that takes no room.
+/// The shape of a character: printable ASCII, Latin-1 letters and a few signs; a box for others. None for a character
+/// without width.
 std::optional<LabelGlyph> labelGlyph(char32_t character);
-/// Of a character that stands above or below the last one, its mark; else 0.
+/// The mark of a combining character; else 0.
 char labelMark(char32_t character);
-/// The glyph with a mark on it: one of `'^~:o,/ (grave, acute, …, diaeresis, ring, cedilla, slash). What is low has no
-/// ascender.
+/// The glyph with a mark, one of `'^~:o,/ (grave, acute, …, diaeresis, ring, cedilla, slash). `isLow` if the glyph has
+/// no ascender.
 LabelGlyph markOn(const LabelGlyph& glyph, char mark, bool isLow);

@@ -10,7 +10,7 @@ namespace {
 constexpr float kLeastDistance = 14; // between labels
 constexpr int kStep = 6;             // decibels
 
-// Decibels of full scale, to a tenth, which three digits leave no room for.
+// Decibels of full scale, to a tenth unless there are three digits.
 std::string labelOf(double decibels)
 {
     const double shown = std::abs(decibels) < 99.95 ? std::round(decibels * 10) / 10 : std::round(decibels);

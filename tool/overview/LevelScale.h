@@ -1,4 +1,4 @@
-// From samples to heights in a lane, and the decibels that its scale names.
+// Maps samples to heights in a lane, and chooses the decibels on its scale.
 #pragma once
 
 #include <string>
@@ -9,7 +9,7 @@ struct Level {
     std::string label;
 };
 
-/// Full scale times the gain is where a picture without gain has full scale: a little within the lane.
+/// Full scale times the gain is where full scale is without gain: slightly inside the lane.
 class LevelScale {
 public:
     LevelScale(float top, float bottom, double gain);
@@ -18,7 +18,7 @@ public:
     float top() const { return top_; }
     float bottom() const { return bottom_; }
 
-    /// What can be seen at the top, each 6 dB below it as far as there is room, and silence; from the top down.
+    /// The level at the top, each 6 dB below it while there is room, and silence; from the top down.
     std::vector<Level> levels() const;
 
 private:

@@ -23,7 +23,7 @@ void addSize(Verb& verb, const std::string& name, int& pixels, std::pair<int, in
                    fmt::format("Its size in pixels, {} to {}; else {}", range.first, range.second, pixels));
 }
 
-// "auto" is a gain that is found; none for another text.
+// "auto" is a gain to be determined; none for an invalid text.
 std::optional<std::optional<double>> gainFromText(const std::string& text)
 {
     if (text == "auto")

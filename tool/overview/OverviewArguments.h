@@ -1,4 +1,4 @@
-// What `ktfiles overview` is asked for.
+// The arguments of `ktfiles overview`.
 #pragma once
 
 #include "tool/overview/Audiowaveform.h"
@@ -13,12 +13,12 @@
 
 struct OverviewArguments {
     FileArguments files;
-    std::string png, svg; // where to; empty: none is drawn
-    std::string sheet;    // where the pictures of all files go together
+    std::string png, svg; // paths of outputs; empty: none
+    std::string sheet;    // path for the pictures of all files together
     std::optional<int> columns;
     PictureSettings picture;
     PictureColors colors = defaultColors();
-    std::string data; // where audiowaveform's data goes; empty: nowhere
+    std::string data; // path of audiowaveform's data; empty: none
     std::int32_t framesPerPoint = 256;
     ChannelChoice channels;
     SoundLength start;
@@ -31,12 +31,12 @@ struct OverviewArguments {
 
     bool draws() const { return !png.empty() || !svg.empty() || !sheet.empty(); }
     bool writes() const { return draws() || !data.empty(); }
-    /// Whether standard output is the picture or the data, and nothing else.
+    /// Whether standard output carries only the picture or the data.
     bool takesOutput() const { return png == "-" || svg == "-" || data == "-"; }
 };
 
-/// The options and the files of the verb. The arguments must outlive the parsing.
+/// Declares the verb's options and files. The arguments must outlive the parsing.
 void declareArguments(Verb& verb, OverviewArguments& arguments);
 
-/// What the parser cannot see: options that make sense only together, or not together. Throws UsageError.
+/// Checks combinations of options that the parser cannot check. Throws UsageError.
 void requireSense(const OverviewArguments& arguments, const Verb& verb, const OutputOptions& output);

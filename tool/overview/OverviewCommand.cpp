@@ -1,4 +1,4 @@
-// ktfiles overview: waveforms as sparklines, numbers and pictures, and stored in the files.
+// ktfiles overview: shows waveforms as sparklines, numbers and pictures, and stores them in the files.
 #include "loops/overview/MDOverview.h"
 #include "tool/overview/ContactSheet.h"
 #include "tool/overview/DrawnSamples.h"
@@ -19,13 +19,13 @@ namespace {
 
 constexpr int kSheetWidth = 320, kSheetHeight = 110; // of each picture
 
-// What is asked for of one file, and what it needs.
+// What is requested for one file, and what it requires.
 struct Task {
     const OverviewArguments& arguments;
-    bool needsPoints; // for what is told of the file
+    bool needsPoints; // for the report on the file
 };
 
-// A file as it was read.
+// A file after reading.
 struct Reading {
     FileOverview overview;
     FileVersion version;
@@ -81,7 +81,7 @@ void requireFewChannels(const SoundReader& sound)
                                   MDOverview::kMostChannels));
 }
 
-// From the overview that is stored where it is asked for and fine enough, else from the samples.
+// From the stored overview if that is requested and it is fine enough, else from the samples.
 WaveformPicture pictureOfFile(const std::string& path, SoundReader* sound, const FileOverview* stored,
                               const OverviewArguments& arguments, bool showsProgress)
 {
@@ -108,7 +108,7 @@ void writeData(const std::string& path, SoundReader& sound, const OverviewArgume
     const FrameRange range = rangeIn(sound.info().frames, sampleRateOf(sound.info()), arguments);
     ChannelChoice channels = arguments.channels;
     if (channels.kind == ChannelChoice::Kind::overview)
-        channels.kind = ChannelChoice::Kind::sum; // as the project's own program does
+        channels.kind = ChannelChoice::Kind::sum; // like the project's own program
     const AudiowaveformSettings settings{.format = *audiowaveformFormatOf(arguments.data),
                                          .from = range.from,
                                          .to = range.to,
@@ -120,7 +120,7 @@ void writeData(const std::string& path, SoundReader& sound, const OverviewArgume
     });
 }
 
-// By the file's own name, or below a folder by where it is in it.
+// The file's own name, or its path below the named folder.
 std::string sheetName(const FoundFile& file)
 {
     if (!file.isBelowFolder())
@@ -129,7 +129,7 @@ std::string sheetName(const FoundFile& file)
     return start == std::string::npos ? file.path : file.path.substr(start);
 }
 
-// Ahead of the reading, which may take minutes. One that is the file itself is refused later, whatever is asked for.
+// Checked before reading, which may take minutes. An output that is the file itself is refused later in any case.
 void requireFreeNames(const std::string& path, const OverviewArguments& arguments)
 {
     std::error_code error;
@@ -138,7 +138,7 @@ void requireFreeNames(const std::string& path, const OverviewArguments& argument
             requireFreeName(out, arguments.existing);
 }
 
-// The sheet is written when all are read, so that none of them may be it.
+// The sheet is written after all files are read, so none of them may be the sheet.
 void requireIsNotSheet(const std::string& path, const OverviewArguments& arguments)
 {
     std::error_code error;
@@ -173,7 +173,7 @@ Reading readFile(const std::string& path, const Task& task)
     return reading;
 }
 
-// Files are edited one by one. What was changed meanwhile, if only by the edit of another of its names, is read again.
+// Edits files one by one. A file that changed meanwhile, even by an edit of another of its names, is read again.
 StoreResult store(const std::string& path, Reading& reading, const OverviewArguments& arguments)
 {
     SafeEdit edit(path, arguments.edit);

@@ -74,7 +74,7 @@ void OverviewReport::add(const std::string& path, const FileOverview& overview, 
                       range.minimum, range.maximum, sparkline(waveform, kSparklineInPipes));
     }
     if (form_ == Form::table)
-        output_.flush(); // the next file may take its time
+        output_.flush(); // the next file may take a while
 }
 
 void OverviewReport::addSparkline(const std::string& path, const Waveform& waveform)

@@ -1,4 +1,5 @@
-// What `ktfiles overview` prints of each file: a sparkline, a line for scripts, JSON, or what was drawn and stored.
+// Prints the result of `ktfiles overview` for each file: a sparkline, a line for scripts, JSON, or what was drawn and
+// stored.
 #pragma once
 
 #include "tool/overview/FileOverview.h"
@@ -10,10 +11,10 @@
 #include <string>
 #include <vector>
 
-/// What was done with a file's overview beside showing it.
+/// What was done with a file's overview other than showing it.
 struct OverviewDeeds {
-    std::string png, svg, data; // the files that were written; empty or "-": none to tell of
-    std::string sheet;          // told of when it is written
+    std::string png, svg, data; // files written; empty or "-": not reported
+    std::string sheet;          // reported when it is written
     int width = 0, height = 0;
     std::optional<StoreResult> store;
     bool dryRun = false;
@@ -23,10 +24,10 @@ struct OverviewDeeds {
 
 class OverviewReport {
 public:
-    /// The files that will come are for the width of the names.
+    /// The files to come determine the width of the names.
     OverviewReport(const OutputOptions& options, const FileArguments& files);
 
-    /// The overview has points unless there are deeds to tell of, and no JSON to write.
+    /// The overview must have points unless there are deeds to report and no JSON to write.
     void add(const std::string& path, const FileOverview& overview, const OverviewDeeds& deeds);
     void addSheet(const std::string& out, std::size_t files, int width, int height);
     void addFailure(const std::string& path, const std::string& text);

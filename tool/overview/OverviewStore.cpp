@@ -29,7 +29,7 @@ bool areEqual(const KTMem& a, const KTMem& b)
     return a.size() == b.size() && std::memcmp(a.data(), b.data(), a.size()) == 0;
 }
 
-// CAF keeps no overview of silence.
+// CAF stores no overview of silence.
 bool isKept(const FileOverview& overview)
 {
     const auto points = overview.waveform().points;

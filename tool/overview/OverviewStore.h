@@ -6,16 +6,16 @@
 
 #include <string>
 
-/// What storing came to.
+/// The result of storing.
 struct StoreResult {
     bool stored = false;  // the file holds its overview, or with --dry-run would
     bool changed = false; // it did not before
     std::string backup;
 };
 
-/// Throws Failure for a file that is no container, which overviews are not stored in.
+/// Throws Failure if the file is no container, because overviews are stored only there.
 void requireRoomForOverview(const std::string& path);
 
-/// Stores the overview in the file, in the place of the one that it has. The edit must have begun before the overview
-/// was computed. Of silence a CAF file keeps none. Throws Failure.
+/// Stores the overview in place of the file's former one. The edit must have begun before the overview was computed. A
+/// CAF file stores none of silence. Throws Failure.
 StoreResult storeOverview(SafeEdit& edit, FileOverview& overview, const EditOptions& options);

@@ -28,7 +28,7 @@ struct PNGFile::Writer {
     }
     static void flush(png_structp) {}
 
-    // libpng leaves by a jump when something is wrong; nothing in between has a destructor.
+    // libpng reports errors with a longjmp, so nothing in between may have a destructor.
     template <class Work>
     void run(const Work& work)
     {

@@ -1,4 +1,4 @@
-// A PNG file of palette indices, written row by row.
+// Writes a PNG file of palette indices row by row.
 #pragma once
 
 #include "tool/overview/PictureColors.h"
@@ -15,11 +15,11 @@ public:
     PNGFile(const PNGFile&) = delete;
     PNGFile& operator=(const PNGFile&) = delete;
 
-    /// The next rows, which are as wide as the file.
+    /// Adds the next rows, which have the file's width.
     void add(const Raster& rows);
-    /// When all rows were added.
+    /// Call after all rows were added.
     void finish();
-    /// The bytes since the last call.
+    /// The bytes produced since the last call.
     std::string take();
 
 private:

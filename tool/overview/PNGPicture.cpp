@@ -8,7 +8,7 @@
 
 namespace {
 
-// Draws in the pixels of the PNG, of which each of the picture's has `factor` by `factor`.
+// Draws in pixels of the PNG, `factor` by `factor` for each of the picture's.
 class PictureDrawing {
 public:
     PictureDrawing(Raster& raster, const WaveformPicture& picture, int x, int y)
@@ -62,7 +62,7 @@ private:
         }
     }
 
-    // Every pixel near the line, by its distance from it.
+    // Sets every pixel near the line according to its distance.
     void drawLine(const PictureLane& lane)
     {
         const float reach = kLineWidth / 2 * scale_;
@@ -85,7 +85,7 @@ private:
         const int plot = frame_.left * factor_, end = frame_.width * factor_;
         const int firstRow = static_cast<int>(lane.top * scale_), lastRow = static_cast<int>(lane.bottom * scale_);
         for (int x = clamped(x0 - reach - 1, plot, end); x < clamped(x0 + dx + reach + 2, plot, end); ++x) {
-            // Of a steep line over many rows only those near its place in this column.
+            // On a steep line over many rows, only rows near the line in this column count.
             const float near = dx > 0 ? std::clamp((static_cast<float>(x) + 0.5F - x0) / dx, 0.0F, 1.0F) : 0;
             const float spread = (dx > 0 ? std::abs(dy / dx) * (reach + 1) : std::abs(dy)) + reach + 1;
             const float centre = y0 + near * dy;
@@ -155,7 +155,7 @@ private:
     const PictureFrame& frame_;
     int factor_;
     float scale_;
-    int x_, y_; // of the picture in the raster
+    int x_, y_; // position of the picture in the raster
 };
 
 } // namespace

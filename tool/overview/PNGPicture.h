@@ -7,8 +7,8 @@
 
 #include <string>
 
-/// Draws the picture, antialiased, with its corner at (x, y) of the picture's own pixels.
+/// Draws the picture antialiased, with its corner at (x, y) in the picture's own pixels.
 void drawPicture(Raster& raster, const WaveformPicture& picture, int x, int y);
 
-/// The bytes of the PNG file. Throws Failure.
+/// The content of the PNG file. Throws Failure.
 std::string pngOf(const WaveformPicture& picture, const PictureColors& colors);

@@ -14,16 +14,16 @@ struct PictureColors {
     Color wave, background, axis, clipping;
 };
 
-/// `part` of `to` in `from`, 0 to 1; what is transparent adds no color of its own.
+/// Mixes `part` of `to`, 0 to 1, into `from`; transparency adds no color.
 Color mixed(Color from, Color to, double part);
 
 /// The default theme.
 PictureColors defaultColors();
 
-/// From the name of a theme, or "WAVE,BACKGROUND[,AXIS[,CLIPPING]]" of hexadecimal colors ("1F6FEB", "#1F6FEB" or
-/// "#abc"); the background may be "none". Without an axis color one is chosen that shows on the background, and without
-/// one of clipping one that differs from the wave. None for anything else.
+/// Parses the name of a theme, or "WAVE,BACKGROUND[,AXIS[,CLIPPING]]" with hexadecimal colors ("1F6FEB", "#1F6FEB" or
+/// "#abc"); the background may be "none". A missing axis color is chosen to contrast with the background, a missing
+/// clipping color to differ from the wave. None for any other text.
 std::optional<PictureColors> colorsFromText(const std::string& text);
 
-/// The names of the themes, for messages and help.
+/// Theme names for messages and help.
 std::string themeNames();

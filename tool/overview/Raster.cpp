@@ -51,7 +51,7 @@ void ColumnCoverage::add(float top, float bottom, float weight)
     addEdge(std::clamp(bottom, 0.0F, rows), -weight);
 }
 
-// Everything below the edge is covered, and of its own row the part below.
+// Covers everything below the edge, and in its own row the part below it.
 void ColumnCoverage::addEdge(float y, float weight)
 {
     const auto row = static_cast<std::size_t>(y);

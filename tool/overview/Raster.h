@@ -1,4 +1,4 @@
-// A raster of palette indices: a waveform picture knows only the background, the wave, the axis and clipping on it.
+// A raster of palette indices, which stand for the background, the wave, the axis and clipping.
 #pragma once
 
 #include "tool/overview/PictureColors.h"
@@ -18,7 +18,7 @@ public:
     const std::vector<std::uint8_t>& pixels() const { return pixels_; }
     static std::array<Color, 256> palette(const PictureColors& colors);
 
-    /// The wave over the axis, 0 to 1; of two waves the stronger stays. Nothing of it leaves the pixel alone.
+    /// Draws the wave over the axis, coverage 0 to 1. The stronger of two waves remains; 0 changes nothing.
     void putWave(int x, int y, float coverage)
     {
         if (const int level = static_cast<int>(coverage * kWaveLevels + 0.5F); level > 0) {
@@ -26,11 +26,11 @@ public:
             pixel = static_cast<std::uint8_t>(pixel <= kWaveLevels ? std::max<int>(pixel, level) : level);
         }
     }
-    /// Over all else.
+    /// Covers everything else.
     void putMark(int x, int y, bool isClipping) { at(x, y) = isClipping ? kClipping : kWholeAxis; }
-    /// A part of the axis, 0 to 1; the stronger of two stays. Outside of the raster nothing happens.
+    /// Draws a part of the axis, 0 to 1; the stronger of two remains. Ignores positions outside the raster.
     void putAxis(int x, int y, float coverage);
-    /// A rectangle of the axis; edges between pixels are softened.
+    /// Fills a rectangle in the axis color; edges between pixels are antialiased.
     void fillAxis(float left, float top, float right, float bottom, float tone);
 
 private:
@@ -48,19 +48,19 @@ private:
     std::vector<std::uint8_t> pixels_;
 };
 
-/// How much of each pixel of a column is covered by spans of it.
+/// Accumulates how much of each pixel in a column is covered by spans.
 class ColumnCoverage {
 public:
     explicit ColumnCoverage(int rows) : changes_(static_cast<std::size_t>(rows) + 2), coverage_(changes_.size()) {}
 
-    /// Adds `weight` times the span, cut to the column.
+    /// Adds `weight` times the span, clipped to the column.
     void add(float top, float bottom, float weight);
-    /// The coverage of every row, by the spans added since the last call.
+    /// The coverage of every row by the spans added since the last call.
     const std::vector<float>& take();
 
 private:
     void addEdge(float y, float weight);
 
-    std::vector<float> changes_; // of the coverage, from row to row
+    std::vector<float> changes_; // differences of coverage between rows
     std::vector<float> coverage_;
 };

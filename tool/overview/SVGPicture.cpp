@@ -15,13 +15,13 @@ std::string hex(Color color)
     return fmt::format("#{:02x}{:02x}{:02x}", color.red, color.green, color.blue);
 }
 
-// To a hundredth of a pixel, as short as it goes.
+// To a hundredth of a pixel, without trailing zeros.
 std::string number(float value)
 {
     return fmt::format("{:.7g}", std::round(static_cast<double>(value) * 100) / 100);
 }
 
-// Stairs, one step per column: along the upper edges, and back along the lower ones.
+// Stairs with one step per column: along the upper edges and back along the lower ones.
 std::string stairs(const std::vector<PictureExtent>& extents, const PictureFrame& frame)
 {
     const float width = 1.0F / static_cast<float>(frame.scaleFactor), left = static_cast<float>(frame.left);
@@ -42,7 +42,7 @@ const char* word(Anchor anchor)
     return anchor == Anchor::start ? "start" : anchor == Anchor::end ? "end" : "middle";
 }
 
-// Lines of the axes as path data, and their labels as elements.
+// Path data of the axes' lines, and elements for their labels.
 struct AxisParts {
     std::string lines, faintLines, labels;
 };
@@ -76,7 +76,7 @@ AxisParts scale(const WaveformPicture& picture)
     return parts;
 }
 
-// The names of the lanes, and what keeps them apart.
+// The names of the lanes and the lines between them.
 AxisParts laneParts(const WaveformPicture& picture)
 {
     AxisParts parts;
@@ -95,7 +95,7 @@ std::string axisText(const AxisParts& parts, Color color, float faintTone)
            svgLabels(parts.labels, color);
 }
 
-// Cut to its lane: the view box of an element of its own.
+// Clipped to its lane by the view box of a nested element.
 std::string lineText(const PictureLane& lane, const PictureFrame& frame, Color color)
 {
     std::string path, dots;

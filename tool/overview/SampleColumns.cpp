@@ -12,7 +12,7 @@ constexpr std::int64_t kRun = kOverviewFramesPerPoint;
 struct Extremes {
     float low = std::numeric_limits<float>::infinity(), high = -low;
 
-    // A NaN is neither.
+    // A NaN fails both comparisons.
     void add(float sample)
     {
         low = sample < low ? sample : low;
@@ -20,8 +20,8 @@ struct Extremes {
     }
 };
 
-// A number of samples side by side, of which the compiler makes vectors: where channels divide it, each of them is
-// always of one channel, and one pass finds the extremes of all.
+// Number of samples processed side by side, which the compiler vectorizes. If the number of channels divides it, each
+// position belongs to one channel, so one pass finds the extremes of all.
 constexpr int kSide = 16;
 
 constexpr bool divides(int channels)
@@ -31,7 +31,7 @@ constexpr bool divides(int channels)
 
 class SideBySide {
 public:
-    // Frames of a number of channels that divides.
+    // For a number of channels that divides kSide.
     void fold(const float* samples, std::int64_t count)
     {
         low_.fill(std::numeric_limits<float>::infinity());
@@ -53,7 +53,7 @@ public:
     {
         Extremes extremes;
         for (auto i = static_cast<std::size_t>(channel); i < kSide; i += static_cast<std::size_t>(channels)) {
-            extremes.low = std::min(extremes.low, low_[i]); // where no sample fell, infinite
+            extremes.low = std::min(extremes.low, low_[i]); // infinite if there were no samples
             extremes.high = std::max(extremes.high, high_[i]);
         }
         return extremes;
@@ -83,7 +83,7 @@ Extremes ofSum(const float* samples, std::int64_t frames, int channels)
     return extremes;
 }
 
-// The extremes of frames, as lanes want them.
+// Finds the extremes of frames for each lane.
 class RunExtremes {
 public:
     RunExtremes(const float* samples, std::int64_t frames, int channels)
@@ -120,7 +120,7 @@ public:
             }
             break;
         }
-        if (extremes.low > extremes.high) // nothing but NaNs
+        if (extremes.low > extremes.high) // only NaNs
             extremes.low = extremes.high = 0;
         return extremes;
     }
@@ -152,7 +152,7 @@ SampleColumns::SampleColumns(const std::vector<SoundLane>& lanes, int channels, 
 {
 }
 
-// A column that ends where a frame begins has nothing of it, whatever rounding says.
+// A column that ends where a frame begins contains none of it, despite rounding.
 constexpr double kSlack = 1e-6;
 
 std::int64_t SampleColumns::begin(std::size_t column) const

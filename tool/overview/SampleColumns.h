@@ -1,4 +1,4 @@
-// Samples folded into columns: what a picture, or a list of points, shows of each lane of a sound.
+// Folds samples into the columns of a picture, or the points of a list, for each lane of a sound.
 #pragma once
 
 #include "tool/overview/SoundLanes.h"
@@ -7,22 +7,22 @@
 #include <cstdint>
 #include <vector>
 
-/// The columns of each lane. Frames are given in the order of the sound, without a gap. A frame that two columns share
-/// shows in both, so that no peak is drawn lower than it is. Values are samples, full scale being 1; the averages are
-/// those of the extremes of runs of 256 frames, or of shorter ones where a column has no more.
+/// The columns of each lane. Frames are added in order, without gaps. A frame that two columns share counts in both, so
+/// that no peak is drawn too low. Values are samples with full scale 1; averages are those of the extremes of runs of
+/// 256 frames, or of shorter runs if a column has fewer.
 class SampleColumns {
 public:
-    /// Column i is of the frames from `first` + i * `framesPerColumn` on; that is 1 at least.
+    /// Column i begins at frame `first` + i * `framesPerColumn`; the latter is at least 1.
     SampleColumns(const std::vector<SoundLane>& lanes, int channels, double first, double framesPerColumn,
                   std::size_t columns);
 
-    /// Interleaved frames, the first of which is frame `frame` of the sound.
+    /// Adds interleaved frames, beginning with frame number `frame` of the sound.
     void add(const float* samples, std::int64_t frame, std::int64_t frames);
 
-    /// Of a lane, every column. One without a frame is of zeros.
+    /// All columns of a lane. A column without frames is zero.
     std::vector<WaveformColumn> take(std::size_t lane);
 
-    /// The frames that the columns reach over.
+    /// The frames that the columns cover.
     std::int64_t firstFrame() const { return begin(0); }
     std::int64_t endFrame() const { return end(columns_ - 1); }
 
@@ -40,6 +40,6 @@ private:
     int channels_;
     double first_, framesPerColumn_;
     std::size_t columns_;
-    std::size_t open_ = 0; // the first column that may have frames to come
+    std::size_t open_ = 0; // first column that may still get frames
     std::vector<std::vector<Fold>> folds_;
 };

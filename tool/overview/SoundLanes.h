@@ -1,4 +1,4 @@
-// The lanes of a waveform: which channels of a sound each of them shows, and what it is called.
+// The lanes of a waveform: which channels each one shows, and its name.
 #pragma once
 
 #include "audiofile/AudioFileInfo.h"
@@ -9,26 +9,26 @@
 
 struct SoundLane {
     enum class Kind {
-        channel, // one of them
-        sum,     // the average of all
-        halves,  // of stereo: the peak of the left one upwards, that of the right one downwards, as overviews have them
-        folded,  // the lowest and the highest of all, zero included, as overviews have them
+        channel, // one channel
+        sum,     // average of all
+        halves,  // stereo as in overviews: peaks of the left channel upwards, of the right one downwards
+        folded,  // as in overviews: lowest and highest of all channels, zero included
     };
     Kind kind = Kind::folded;
     int channel = 0;        // counted from 0
-    std::string label;      // "L", "LFE", "Ch 3"; empty: there is nothing to tell apart
+    std::string label;      // "L", "LFE", "Ch 3"; empty for a single lane
     std::string lowerLabel; // of halves
 };
 
-/// What is asked for with --channels; the overview's own lane when nothing is.
+/// The choice made with --channels; the default is the overview's own lane.
 struct ChannelChoice {
     enum class Kind { overview, split, sum, one };
     Kind kind = Kind::overview;
-    int number = 0; // of one, counted from 1
+    int number = 0; // of one channel, counted from 1
 };
 
-/// From "split", "sum" or a number from 1 on; none for another text.
+/// Parses "split", "sum" or a number from 1 on; none for any other text.
 std::optional<ChannelChoice> channelChoiceFromText(const std::string& text);
 
-/// The lanes, top to bottom. Throws Failure for a channel that is not there.
+/// The lanes from top to bottom. Throws Failure for a channel that does not exist.
 std::vector<SoundLane> lanesOf(ChannelChoice choice, const AudioFileInfo& info);

@@ -5,5 +5,5 @@
 
 #include <string>
 
-/// `cells` characters, from "▁" for silence to "█" for full scale, each the peak of its share of the file.
+/// `cells` characters from "▁" (silence) to "█" (full scale), each the peak of its share of the file.
 std::string sparkline(const Waveform& waveform, int cells);

@@ -69,7 +69,7 @@ std::vector<TimeTick> timeTicks(double start, double end, double width)
     if (step.seconds / step.divisions * pixelsPerSecond < kGapBetweenSmallTicks)
         step.divisions = 1;
     const double small = step.seconds / step.divisions;
-    constexpr double kSlack = 1e-6; // of a step: a tick at the very end must not be lost to rounding
+    constexpr double kSlack = 1e-6; // of a step, so that rounding does not lose a tick at the very end
     const auto first = static_cast<std::int64_t>(std::ceil(start / small - kSlack));
     const auto last = static_cast<std::int64_t>(std::floor(end / small + kSlack));
     std::vector<TimeTick> ticks;

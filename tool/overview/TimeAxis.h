@@ -1,4 +1,4 @@
-// The ticks of a time axis: round times, so far apart that their labels have room.
+// The ticks of a time axis: round times, far enough apart for their labels.
 #pragma once
 
 #include <string>
@@ -9,6 +9,6 @@ struct TimeTick {
     std::string label; // empty: a small tick between labelled ones
 };
 
-/// The ticks from `start` to `end` (seconds, start before end) along `width` pixels. Labels are clock times, or
-/// milliseconds where the axis ends within its first second and whole seconds are too far apart.
+/// The ticks from `start` to `end` (in seconds, start before end) along `width` pixels. Labels are clock times, or
+/// milliseconds if the axis ends within its first second and whole seconds are too far apart.
 std::vector<TimeTick> timeTicks(double start, double end, double width);

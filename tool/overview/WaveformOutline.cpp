@@ -8,8 +8,8 @@ namespace {
 
 constexpr double kFramesOfPoint = static_cast<double>(kOverviewFramesPerPoint);
 
-// Lowest, highest and sums of points. Long runs go through lanes of a fixed number, which the compiler makes vectors
-// of: twelve hours are eight million points.
+// Lowest, highest and sums of points. Long runs are processed in a fixed number of lanes, which the compiler
+// vectorizes: twelve hours have eight million points.
 class PointFold {
 public:
     PointFold()

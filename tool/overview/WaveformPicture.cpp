@@ -10,14 +10,14 @@
 namespace {
 
 constexpr int kTimeStripHeight = 27;
-constexpr int kLowestWithTimeStrip = 72; // below, the wave gets all of the height
+constexpr int kLowestWithTimeStrip = 72; // a lower picture is all wave
 constexpr int kLeastLane = 8;
 constexpr int kScaleWidth = 44;
-constexpr int kNarrowestWithLabels = 120, kNarrowestWithScale = 40; // beside the labels
-constexpr float kUnitEnd = 30;                                      // of the corner below the scale
+constexpr int kNarrowestWithLabels = 120, kNarrowestWithScale = 40; // width beside the labels
+constexpr float kUnitEnd = 30;                                      // in the corner below the scale
 constexpr float kHairline = 1;
-constexpr float kLeastBetweenLabels = 14; // from baseline to baseline
-constexpr float kEdge = 2;                // between a label and the picture's
+constexpr float kLeastBetweenLabels = 14; // between baselines
+constexpr float kEdge = 2;                // between a label and the picture's edge
 constexpr float kGapBetweenTimes = 6;
 constexpr float kMarkHeight = 3;
 constexpr float kLeastBetweenDots = 8;
@@ -29,12 +29,12 @@ PictureExtent extentOf(const LevelScale& scale, float low, float high)
         const float middle = (extent.top + extent.bottom) / 2;
         extent = {middle - kHairline / 2, middle + kHairline / 2};
     }
-    // Also what lies beyond the lane as a whole leaves a trace at its edge.
+    // Anything beyond the lane leaves a trace at its edge.
     return {std::clamp(extent.top, scale.top(), scale.bottom() - kHairline),
             std::clamp(extent.bottom, scale.top() + kHairline, scale.bottom())};
 }
 
-// Where the wave leaves a gap between columns, both go half of the way: a wave has none.
+// Closes gaps between columns by extending both halfway, because a wave has no gaps.
 void join(std::vector<PictureExtent>& extents)
 {
     for (std::size_t i = 1; i < extents.size(); ++i) {
@@ -46,7 +46,7 @@ void join(std::vector<PictureExtent>& extents)
     }
 }
 
-// What is drawn of one lane.
+// Draws one lane.
 class LaneDrawing {
 public:
     LaneDrawing(WaveformPicture& picture, const DrawnSound& sound, const LevelScale& scale)
@@ -146,7 +146,7 @@ void markTimes(WaveformPicture& picture, double start, double end)
     float taken = left - kGapBetweenTimes;
     for (TimeTick& tick : timeTicks(start, end, frame.plotWidth)) {
         const double x = frame.left + (tick.seconds - start) / (end - start) * frame.plotWidth;
-        // The last tick of all stands at the very edge, on the last column.
+        // The very last tick is moved onto the last column.
         PictureTick placed{static_cast<float>(std::clamp(x, 0.0, frame.width - 1.0)), {}, 0, Anchor::middle};
         if (!tick.label.empty()) {
             const float width = broadestWidth(tick.label, kLabelHeight), centre = std::floor(placed.at) + 0.5F;
@@ -166,7 +166,7 @@ void markTimes(WaveformPicture& picture, double start, double end)
     }
 }
 
-// Labels from the top down; one that has no room below the last has none.
+// Places labels from the top down and drops those without room.
 class LabelColumn {
 public:
     explicit LabelColumn(std::vector<PictureTick>& ticks, float height) : ticks_(ticks), height_(height) {}

@@ -1,4 +1,4 @@
-// ktfiles pair: the stereo pairs among files that are kept as two mono halves, and the halves that miss their partner.
+// ktfiles pair: lists stereo pairs among files that are two mono halves, and halves without a partner.
 #include "tool/shared/arguments/CommandLine.h"
 #include "tool/shared/input/FileByFile.h"
 #include "tool/shared/input/FileFacts.h"

@@ -1,4 +1,4 @@
-// What the objects of `ktfiles project` are told on the command line.
+// The arguments of the objects of `ktfiles project`.
 #pragma once
 
 #include "tool/shared/access/Waiting.h"
@@ -14,7 +14,7 @@ struct ProjectArguments {
     int keep = 0;
     bool missing = false;
     bool create = false;
-    bool undo = false;   // of an exchange that was cut short
+    bool undo = false;   // an exchange that was cut short
     bool forget = false; // likewise
     EditOptions edit;
     WaitOptions wait;

@@ -34,7 +34,7 @@ void requireNoEnd()
         throw Failure("interrupted");
 }
 
-/// Everything but an owner that this user may not give away.
+/// Copies everything except an owner that this user may not set.
 void keepAttributes(int from, platform::FileAttributes attributes, int to)
 {
     platform::FileAttributes own;
@@ -49,7 +49,7 @@ void keepAttributes(int from, platform::FileAttributes attributes, int to)
     synchronize(to);
 }
 
-/// A link is followed: what it leads to is what the backup is for.
+/// Follows a link, because its target is what the backup is for.
 void copyFile(const fs::path& from, const fs::path& to, bool quiet)
 {
     const platform::OwnedDescriptor source(::open(from.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK));
@@ -69,7 +69,7 @@ void copyFile(const fs::path& from, const fs::path& to, bool quiet)
 
 void copyItem(const fs::path& from, const fs::path& to, bool quiet);
 
-/// The attributes come last, so that what is in a read-only folder can be copied too.
+/// Sets the attributes last, so that the content of a read-only folder can be copied.
 // NOLINTNEXTLINE(misc-no-recursion): no deeper than the folders are
 void copyFolder(const fs::path& from, const fs::path& to, bool quiet)
 {
@@ -90,7 +90,7 @@ void copyItem(const fs::path& from, const fs::path& to, bool quiet)
 {
     const bool isLink = fs::is_symlink(fs::symlink_status(from));
     const fs::file_status leadsTo = fs::status(from);
-    if (isLink && !fs::is_regular_file(leadsTo)) // a folder could be one around it
+    if (isLink && !fs::is_regular_file(leadsTo)) // a folder could be an enclosing one
         throw Failure(from.filename().string() + " is a link, and not to a file: a backup would hold the link alone");
     if (fs::is_directory(leadsTo))
         copyFolder(from, to, quiet);
@@ -111,10 +111,10 @@ void copyAlternative(const fs::path& alternative, const fs::path& unfinished, bo
     }
 }
 
-/// The name that the backup has taken. Only when there is none are old ones deleted first.
+/// The name that the backup took. Deletes old backups first only if no name is free.
 platform::URLRef publish(UnfinishedBackup& unfinished, const platform::URLRef& package, long alternative, int keep)
 {
-    constexpr int kMostAttempts = 10; // somebody may take the name, who knows nothing of coordination
+    constexpr int kMostAttempts = 10; // others who do not coordinate may take the name
     for (int attempt = 0; attempt < kMostAttempts; ++attempt) {
         const auto name = [&](PurgeOldBackups purge) {
             return ProjectInformation::urlForNewBackupForBundleURL(package, alternative, CreateDirectories::no,

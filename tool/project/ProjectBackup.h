@@ -1,13 +1,13 @@
-// Making a backup of an alternative's project data.
+// Makes a backup of an alternative's project data.
 #pragma once
 
 #include "project/ProjectInformation.h"
 
 #include <string>
 
-constexpr int kMostBackups = 100; // that two digits name
+constexpr int kMostBackups = 100; // names have two digits
 
-/// Copies the project data, with the metadata and the ARA data, to a new backup, which takes its name when it is whole.
-/// Then the oldest go where there are more than `keep`; 0 keeps all. Returns its name, nothing for a dry run. Throws
-/// Failure, also when the backup stands but old ones cannot be deleted.
+/// Copies the project data, metadata and ARA data to a new backup, which gets its name when it is complete. Then
+/// deletes the oldest backups beyond `keep`; 0 keeps all. Returns the name, or nothing for a dry run. Throws Failure,
+/// also if the backup exists but old ones cannot be deleted.
 std::string makeBackup(const ProjectInformation& project, long alternative, int keep, bool dryRun, bool quiet);

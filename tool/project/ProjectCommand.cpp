@@ -1,4 +1,4 @@
-// ktfiles project: project packages, what they say of themselves, their media, folders and backups.
+// ktfiles project: project packages, their metadata, media, folders and backups.
 #include "platform/ApplicationInfo.h"
 #include "tool/project/ProjectArguments.h"
 #include "tool/project/ProjectBackup.h"
@@ -16,7 +16,7 @@
 
 namespace {
 
-/// Failures go to standard error, and into the JSON where that is asked for.
+/// Reports failures on standard error, and in the JSON if that is requested.
 bool runOn(const std::string& path, const OutputOptions& output, const std::function<void()>& work)
 {
     if (path.empty())
@@ -48,7 +48,7 @@ void renameAlternative(const ProjectArguments& arguments, const OutputOptions& o
         const auto project = openProject(package);
         const auto url =
             ProjectInformation::projectInformationURLForBundleURL(project->projectURL(), CreateDirectories::no);
-        SafeEdit edit(url->posixPath(), arguments.edit); // ahead of the reading, so that it notices other changes
+        SafeEdit edit(url->posixPath(), arguments.edit); // before reading, so that other changes are noticed
         auto info = ProjectInformation::infoDictionaryFromProjectBundleURL(project->projectURL());
         auto names = project->alternativeNames();
         const auto found = names.find(std::to_string(arguments.index));
@@ -141,7 +141,7 @@ void declareEdits(CommandLine& commandLine, Verb& project, ProjectArguments& arg
             name, description,
             [&, work] {
                 arguments.edit.quiet = arguments.wait.quiet = output.quiet;
-                if (arguments.edit.timeout) // an option of edits of a file: for the package too
+                if (arguments.edit.timeout) // an option for edits of files, here for the package
                     arguments.wait.timeoutSeconds = arguments.edit.timeout;
                 return runOn(arguments.package, output, [&] { work(arguments, output); });
             },

@@ -40,7 +40,7 @@ void printProjectMedia(const std::string& path, ProjectInformation& project, std
                        bool onlyMissing, const OutputOptions& options)
 {
     if (alternative)
-        alternativeOf(project, alternative); // or it says that there is none
+        alternativeOf(project, alternative); // throws if there is none
     std::vector<std::vector<std::string>> rows;
     JsonWriter media;
     media.beginArray();

@@ -1,4 +1,4 @@
-// The files that a project uses, and the folders that it has for them.
+// The files that a project uses, and its folders for them.
 #pragma once
 
 #include "files/CFileRef.h"
@@ -7,10 +7,10 @@
 
 #include <optional>
 
-/// Of one alternative, or of all; each file once for each kind, in the order of the names' bytes.
+/// For one alternative or all; each file once per kind, in byte order of the names.
 void printProjectMedia(const std::string& path, ProjectInformation& project, std::optional<long> alternative,
                        bool onlyMissing, const OutputOptions& options);
 
-/// Of any kind of project, whose folder is `base`; created first where that is asked for. Throws Failure.
+/// For any kind of project, whose folder is `base`; creates the folders first if requested. Throws Failure.
 void printProjectDirectories(const std::string& path, const CFileRef& base, std::optional<long> alternative,
                              bool create, const OutputOptions& options);

@@ -9,14 +9,14 @@
 
 namespace {
 
-/// How many files of a kind an alternative uses, and how many of them are not there.
+/// How many files of a kind an alternative uses, and how many of them are missing.
 struct MediaCount {
     const ProjectMediaList* list;
     std::size_t count = 0, missing = 0;
 };
 
 struct AlternativeReport {
-    std::string key; // of the dictionary of names
+    std::string key; // in the dictionary of names
     std::optional<long> index;
     std::string name;
     bool isActive = false;
@@ -84,7 +84,7 @@ void writeJson(JsonWriter& json, ProjectInformation& project, const AlternativeR
     json.endObject();
 }
 
-/// "120 BPM, C# minor, 4/4, 24 tracks, 48 kHz", as far as it is known.
+/// "120 BPM, C# minor, 4/4, 24 tracks, 48 kHz", as far as known.
 std::string musicOf(ProjectInformation& project, long index)
 {
     std::string text;
@@ -125,7 +125,7 @@ void printTable(const AlternativeReport& report, ProjectInformation& project, bo
                          : "an unknown backup");
 }
 
-/// By line: index, whether it is active, name, tempo, key, mode, signature, tracks, rate, media, missing, backups.
+/// A line with index, active mark, name, tempo, key, mode, signature, tracks, rate, media, missing, backups.
 void printLine(const AlternativeReport& report, ProjectInformation& project)
 {
     std::size_t count = 0, missing = 0;
@@ -133,7 +133,7 @@ void printLine(const AlternativeReport& report, ProjectInformation& project)
         count += media.count;
         missing += media.missing;
     }
-    const long index = report.index.value_or(std::numeric_limits<long>::max()); // one that has no metadata
+    const long index = report.index.value_or(std::numeric_limits<long>::max()); // one without metadata
     Output::standard().print("{}\t{}\t{}\t{:g}\t{}\t{}\t{}/{}\t{}\t{}\t{}\t{}\t{}\n", printable(report.key),
                              report.isActive ? "active" : "", printable(report.name), project.beatsPerMinute(index),
                              printable(project.songKeyAsNonLocalizedString(index).value_or("")),

@@ -1,4 +1,4 @@
-// What `ktfiles project` tells of a package.
+// Prints what `ktfiles project` has found in a package.
 #pragma once
 
 #include "project/ProjectInformation.h"
@@ -12,7 +12,7 @@ class JsonWriter;
 /// Writes the members of a JSON object.
 using ProjectMembers = std::function<void(JsonWriter& json)>;
 
-/// What an edit has done: `members` for JSON, without the path; `sentence` for people and pipes alike.
+/// Reports an edit: `members` for JSON, without the path; `sentence` for people and pipes.
 void printProjectEdit(const std::string& path, const OutputOptions& options, const ProjectMembers& members,
                       const std::string& sentence);
 

@@ -1,4 +1,4 @@
-// Exchanging an alternative's data with a backup's, and settling an exchange that was cut short.
+// Exchanges an alternative's data with a backup's, and settles an exchange that was cut short.
 #pragma once
 
 #include "tool/project/ProjectArguments.h"

@@ -20,7 +20,7 @@ namespace {
 constexpr const char* kPrefix = ".ktfiles-backup";
 constexpr int kMostAttempts = 100;
 
-/// Locked for this process; false when another has it, or it is no folder.
+/// The folder, locked for this process; false if another process holds it, or it is no folder.
 platform::OwnedDescriptor lockedFolder(const fs::path& path)
 {
     platform::OwnedDescriptor folder(::open(path.c_str(), O_RDONLY | O_DIRECTORY | O_NOFOLLOW | O_CLOEXEC));
@@ -55,7 +55,7 @@ UnfinishedBackup::UnfinishedBackup(const fs::path& backups)
         }
         lock_ = lockedFolder(path);
         struct stat status = {};
-        // Another run may have taken it for an abandoned one before it was locked.
+        // Another process may have locked the new folder first, taking it for an abandoned one.
         if (lock_ && ::fstat(lock_.get(), &status) == 0 && status.st_nlink > 0) {
             path_ = path;
             return;

@@ -1,26 +1,26 @@
-// The folder in which a backup is made, until it is whole and takes its name.
+// The folder in which a backup is made, until it is complete and gets its name.
 #pragma once
 
 #include "platform/OwnedDescriptor.h"
 
 #include <filesystem>
 
-/// Hidden, so that a backup of which half is there is none; with a name of its own and locked, so that it is told from
-/// one that a killed process left. Throws Failure.
+/// Hidden, so that half a backup does not pass for one; uniquely named and locked, so that it is distinguished from one
+/// that a killed process left. Throws Failure.
 class UnfinishedBackup {
 public:
-    /// In the folder of backups, which is made where it is missing; what killed processes left there goes.
+    /// Creates the folder of backups if necessary, and removes what killed processes left in it.
     explicit UnfinishedBackup(const std::filesystem::path& backups);
-    /// Removes it unless it has its name.
+    /// Removes the folder unless it has got its name.
     ~UnfinishedBackup();
     UnfinishedBackup(const UnfinishedBackup&) = delete;
     UnfinishedBackup& operator=(const UnfinishedBackup&) = delete;
 
     const std::filesystem::path& path() const { return path_; }
-    /// Over an empty folder at most; false when something else has the name.
+    /// Replaces at most an empty folder; false if anything else has the name.
     bool publish(const std::filesystem::path& name);
 
 private:
-    std::filesystem::path path_; // empty once it is published
+    std::filesystem::path path_; // empty once published
     platform::OwnedDescriptor lock_;
 };

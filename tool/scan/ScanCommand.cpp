@@ -1,4 +1,4 @@
-// ktfiles scan: every loop below folders, one record each.
+// ktfiles scan: lists every loop below folders, one record each.
 #include "tool/scan/ScanRecord.h"
 #include "tool/shared/arguments/CommandLine.h"
 #include "tool/shared/arguments/ThreadsOption.h"
@@ -13,7 +13,7 @@
 
 namespace {
 
-// Files travel in batches, which cost the threads less than one by one.
+// Files are passed in batches, which costs the threads less than one by one.
 constexpr std::size_t kBatch = 64;
 constexpr unsigned kBatchesPerThread = 8;
 
@@ -34,7 +34,7 @@ struct BadFile {
     std::string problem;
 };
 
-// Until `give` says that no more is wanted.
+// Walks until `give` returns false.
 void walkBatches(const std::vector<std::string>& folders, const std::function<bool(Batch)>& give)
 {
     Batch batch;
@@ -46,7 +46,7 @@ void walkBatches(const std::vector<std::string>& folders, const std::function<bo
         give(std::move(batch));
 }
 
-// Counts ahead of the scan, which costs it little: no file is opened.
+// Counts the files ahead of the scan, at little cost, because it opens none.
 void countInto(FilesProgress& progress, const std::vector<std::string>& folders, const std::stop_token& stop)
 {
     std::int64_t files = 0;
@@ -58,12 +58,12 @@ void countInto(FilesProgress& progress, const std::vector<std::string>& folders,
         progress.setTotal(files);
 }
 
-// Puts results out in their order, and keeps the bad files, to be listed at the end.
+// Writes results in order, and keeps the bad files for a list at the end.
 class ResultWriter {
 public:
     ResultWriter(ScanWriter& writer, FilesProgress& progress) : writer_(writer), progress_(progress) {}
 
-    /// False when no more is wanted.
+    /// False if no more results are wanted.
     bool add(Records scanned)
     {
         Output& output = Output::standard();
@@ -84,7 +84,7 @@ public:
         return true;
     }
     const std::vector<BadFile>& bad() const { return bad_; }
-    /// "3 loops among 1024 files", for people.
+    /// "3 loops among 1024 files".
     std::string count() const
     {
         const auto counted = [](std::int64_t number, const char* what) {
@@ -101,7 +101,7 @@ private:
     std::vector<BadFile> bad_;
 };
 
-// The work of the threads, done without any.
+// Does the work of the threads if none could be started.
 void scanHere(const std::vector<std::string>& folders, const std::function<Records(const Batch&)>& scan,
               ResultWriter& results)
 {
@@ -116,7 +116,7 @@ void scanByThreads(const std::vector<std::string>& folders, unsigned threads,
         walkBatches(folders, [&](Batch batch) { return work.give(std::move(batch)); });
         work.close();
     });
-    if (!walker.joinable()) // it and who takes its results must not be one thread
+    if (!walker.joinable()) // the walker and the taker of results must be different threads
         return scanHere(folders, scan, results);
     while (auto records = work.take())
         if (!results.add(std::move(*records)))
@@ -156,10 +156,10 @@ bool runScan(const ScanArguments& arguments, const OutputOptions& options)
             results);
     }
     writer.finish();
-    Output::standard().flush(); // ahead of what follows on standard error
+    Output::standard().flush(); // before what follows on standard error
     for (const BadFile& file : results.bad())
         reportFailure(file.path, file.problem);
-    // For who watches: records go to standard output alone, and scripts that keep both find problems only.
+    // For people only: standard output carries the records, and scripts that keep both streams find only problems.
     const progressline::Cleared cleared;
     if (!options.quiet && isTerminal(STDERR_FILENO) && !Output::standard().failed())
         fmt::print(stderr, "{}\n", results.count());

@@ -25,7 +25,7 @@ bool isCalledLoop(const std::string& path)
     return std::ranges::find(kExtensions, extension) != std::end(kExtensions);
 }
 
-// What a row shows of a loop: of keys the words.
+// The cells of a loop's row; keys are shown in words.
 template <std::size_t count>
 std::array<TagText, count> textsCalled(const char* const (&names)[count])
 {
@@ -78,7 +78,7 @@ ScanRecord scanFile(const FoundFile& item, Form form)
         if (!other.isAudio() && isCalledLoop(item.path))
             fail(other.what());
     } catch (const Failure& failure) {
-        // A link that leads nowhere is of interest only when it should lead to a loop.
+        // A dangling link matters only if its name is that of a loop.
         if (isCalledLoop(item.path) || ::access(item.path.c_str(), F_OK) == 0)
             fail(failure.what());
     } catch (const std::bad_alloc&) {
@@ -100,7 +100,7 @@ void addTo(std::vector<ScanRecord>& records, ScanRecord record, Form form)
     records.back().loops += record.loops;
 }
 
-// Rows are written as they come, so that the widths are set beforehand; the path, which no width fits, comes last.
+// Rows are written as they come, so the widths are fixed in advance; the path, which no width fits, comes last.
 ScanWriter::ScanWriter(Form form, const OutputOptions& options)
     : form_(form),
       color_(usesColor(options.color)),

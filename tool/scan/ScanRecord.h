@@ -1,4 +1,4 @@
-// One file of a scan: read by any thread and put into the form of the output, then written in order.
+// One file of a scan: read and formatted by any thread, then written in order.
 #pragma once
 
 #include "tool/shared/input/FoundFile.h"
@@ -12,22 +12,22 @@
 struct ScanRecord {
     enum Kind { none, loop, bad };
     Kind kind = none;
-    std::string path;               // of a bad file
-    std::string text;               // of a loop the record, of several their lines; of a bad file what is wrong
-    std::vector<std::string> cells; // of a loop in a table
+    std::string path;               // set for a bad file
+    std::string text;               // record of a loop, lines of several loops, or the problem of a bad file
+    std::vector<std::string> cells; // set for a loop in a table
     std::size_t loops = 0;
 };
 
-/// Reads one file. A loop is an AIFF or CAF file that has loop tags, transients or another loop chunk, and one of
-/// these, AIFC or WAVE that other programs' chunks call a loop (SamplerTags::describeLoop). Bad is what cannot be read,
-/// but of the files that hold no known audio, and of links to nothing, only those that are called so (".wav", ".aif",
-/// ".aiff", ".aifc", ".caf"). Throws nothing.
+/// Reads one file. A loop is an AIFF or CAF file with loop tags, transients or another loop chunk, or one of these,
+/// AIFC or WAVE that other programs' chunks call a loop (SamplerTags::describeLoop). A bad file cannot be read; among
+/// files without known audio and dangling links, only those with an extension of loops (".wav", ".aif", ".aiff",
+/// ".aifc", ".caf") count as bad. Throws nothing.
 ScanRecord scanFile(const FoundFile& file, Form form);
 
-/// Adds what is to be written: lines join those ahead of them, which spares the threads the handing over of each.
+/// Adds a record to write: a line is appended to the lines before it, so that threads need not pass each one on.
 void addTo(std::vector<ScanRecord>& records, ScanRecord record, Form form);
 
-/// Writes the records of the loops, and in JSON and CSV those of bad files.
+/// Writes the records of loops, and in JSON and CSV those of bad files.
 class ScanWriter {
 public:
     ScanWriter(Form form, const OutputOptions& options);

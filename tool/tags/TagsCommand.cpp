@@ -14,10 +14,10 @@
 
 namespace {
 
-// Writes the tags of one file after the other, each as soon as they are read.
+// Writes the tags of one file after another, each as soon as they are read.
 class TagsWriter : DataRecords {
 public:
-    /// With `several` files each line says which.
+    /// With `several` files each line names its file.
     TagsWriter(const OutputOptions& options, bool several)
         : DataRecords(options, loopColumns()),
           form_(outputForm(options)),

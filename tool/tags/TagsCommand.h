@@ -1,4 +1,4 @@
-// ktfiles tags: what loops say of themselves. Its objects are in files of their own.
+// ktfiles tags: shows the tags of loops. Its objects have files of their own.
 #pragma once
 
 class CommandLine;

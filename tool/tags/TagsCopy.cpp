@@ -1,4 +1,4 @@
-// ktfiles tags copy: every kind of loop chunk from one file to others, AIFF and CAF in either direction.
+// ktfiles tags copy: copies every kind of loop chunk from one file to others, between AIFF and CAF in either direction.
 #include "loops/tags/LoopTagsCopy.h"
 #include "tool/shared/access/FileAccess.h"
 #include "tool/shared/arguments/CommandLine.h"

@@ -1,4 +1,4 @@
-// ktfiles tags set, and remove: the same edit, with values and without.
+// ktfiles tags set and remove: the same edit with values and without.
 #include "loops/tags/LoopTagsSetting.h"
 #include "tool/shared/arguments/CommandLine.h"
 #include "tool/shared/looptags/LoopTagArguments.h"
@@ -9,7 +9,7 @@ namespace {
 
 struct SetArguments {
     std::vector<std::string> words;
-    FileArguments files; // those of the list; the others are among the words
+    FileArguments files; // files of the list; the others are among the words
     EditOptions options;
 };
 

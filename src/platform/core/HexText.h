@@ -1,4 +1,4 @@
-// Bytes as people compare them.
+// Bytes in hexadecimal.
 #pragma once
 
 #include "platform/core/Bytes.h"

@@ -12,7 +12,7 @@ using platform::FileCoordinator;
 
 namespace {
 
-/// Opens with `open`, on another thread where others are in the way.
+/// Opens with `open`; if others are in the way, on another thread.
 FileAccess opened(const std::string& path, const platform::CoordinatedItem& item, bool isWriting,
                   const WaitOptions& wait, const std::function<FileAccess(platform::Error*)>& open,
                   platform::Error* error)

@@ -9,12 +9,12 @@
 
 using FileAccess = std::unique_ptr<platform::CoordinatedAccess>;
 
-/// For as long as the result lives nobody has write access. Null where the system refuses coordination: the file is
-/// then read without it; and under a `ktfiles lock` of the file, which runs this process. Throws Failure, also when the
-/// time is up.
+/// Keeps writers away during the lifetime of the result. Null if the system refuses coordination, in which case the
+/// file is read without it, and under a `ktfiles lock` of the file that runs this process. Throws Failure, also on a
+/// timeout.
 FileAccess accessForReading(const std::string& path, const WaitOptions& wait);
 
-/// For as long as the result lives nobody else has access. Null under a `ktfiles lock` of the file that holds others
-/// back already. Throws Failure, also where the system refuses coordination, and when the time is up.
+/// Keeps everybody else away during the lifetime of the result. Null under a `ktfiles lock` of the file that does so
+/// already. Throws Failure, also if the system refuses coordination, and on a timeout.
 FileAccess accessForWriting(const std::string& path, platform::FileCoordinator::WritingOptions options,
                             const WaitOptions& wait);

@@ -15,7 +15,8 @@ bool waitForLock(int descriptor, const std::string& path, const WaitOptions& wai
 {
     if (const FileLockResult result = platform::tryToLockFile(descriptor); result != FileLockResult::busy)
         return result == FileLockResult::locked;
-    // The lock is the open file's: had too late it goes with the last of its descriptors, which is this copy.
+    // The lock belongs to the open file. If it is acquired too late, it is released with its last descriptor, this
+    // copy.
     const auto copy = std::make_shared<platform::OwnedDescriptor>(::fcntl(descriptor, F_DUPFD_CLOEXEC, 0));
     if (!*copy)
         throw Failure(SystemErrorText(errno));

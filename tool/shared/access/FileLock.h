@@ -1,10 +1,11 @@
-// How the command waits for a file that another edit has locked.
+// Waits for a file that another edit has locked.
 #pragma once
 
 #include "tool/shared/access/Waiting.h"
 
 #include <string>
 
-/// Waits for the lock on the file, which is at `path`; false where the file system has none. Throws Failure when the
+/// Waits for the lock on the file, which is at `path`; false if the file system has no locks. Throws Failure on a
+/// timeout.
 /// time is up.
 bool waitForLock(int descriptor, const std::string& path, const WaitOptions& wait);

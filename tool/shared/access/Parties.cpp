@@ -19,7 +19,7 @@
 
 namespace {
 
-// Readers let each other in, and a presenter holds back whom it is asked for.
+// Readers let each other pass, and a presenter delays those that must ask it.
 bool isInTheWay(const platform::CoordinationParty& party, bool isWriting)
 {
     using Role = platform::CoordinationParty::Role;
@@ -28,23 +28,23 @@ bool isInTheWay(const platform::CoordinationParty& party, bool isWriting)
     return party.role == Role::presents ? party.isWriting == isWriting : party.isWriting || isWriting;
 }
 
-/// The process that started this one; 0 when the process is gone.
+/// The process that started this one; 0 if that is gone.
 int parentOf(int processID)
 {
     std::ifstream file(fmt::format("/proc/{}/stat", processID));
     std::string text;
     std::getline(file, text);
-    const std::size_t name = text.rfind(')'); // which may hold anything
+    const std::size_t name = text.rfind(')'); // the name may contain anything
     int parent = 0;
     char state = 0;
     return name != std::string::npos && std::sscanf(text.c_str() + name + 1, " %c %d", &state, &parent) == 2 ? parent
                                                                                                              : 0;
 }
 
-// "12:34:", the processes that wait for what runs in this environment.
+// "12:34:", the processes that wait for a command run in this environment.
 constexpr const char* kLocksVariable = "KTFILES_LOCKS";
 
-/// Whether a process runs the same file as this one, under whatever name.
+/// Whether a process runs the same program file as this one.
 bool isSameProgram(int processID)
 {
     struct stat own = {}, other = {};
@@ -52,9 +52,9 @@ bool isSameProgram(int processID)
            own.st_dev == other.st_dev && own.st_ino == other.st_ino;
 }
 
-/// Processes above this one that run this command. The only verb of it that runs others is `lock`. It says so in the
-/// environment, which also holds for another copy or version of the command; where the environment was cleared on the
-/// way, the program's file tells it.
+/// Ancestors of this process that run this command. Only its verb `lock` runs other commands, and it announces itself
+/// in the environment, which also works for another copy or version of the command. If the environment was cleared on
+/// the way, the ancestor's program file shows it.
 const std::set<int>& locksAbove()
 {
     static const std::set<int> found = [] {
@@ -72,7 +72,7 @@ const std::set<int>& locksAbove()
     return found;
 }
 
-using Processes = std::map<int, std::string>; // each once, with its name in words
+using Processes = std::map<int, std::string>; // each process once, with a description
 
 void addTo(Processes& processes, int id)
 {
@@ -94,8 +94,8 @@ std::string wordsFor(const Processes& processes)
 
 enum class FileLockKind { none, read, write };
 
-/// "lock:	1: POSIX  ADVISORY  READ 17 fe:01:1234 0 EOF", and OFDLCK for a lock of the open file: the two kinds
-/// that are in each other's way.
+/// Parses "lock:   1: POSIX  ADVISORY  READ 17 fe:01:1234 0 EOF"; OFDLCK stands for a lock of the open file. These two
+/// kinds exclude each other.
 FileLockKind lockIn(const std::filesystem::path& descriptorInformation)
 {
     FileLockKind found = FileLockKind::none;
@@ -115,16 +115,16 @@ struct OpenFile {
     std::filesystem::path descriptorInformation;
 };
 
-/// Where other processes that this one may look into have the file open.
+/// Descriptors of the file in other processes that this one may examine.
 std::vector<OpenFile> othersWith(int descriptor)
 {
-    // What is known of a file is enough: a server that does not answer must not be waited for here.
+    // Cached attributes are enough: a server that does not respond must not be waited for here.
     constexpr int kAsKnown = AT_STATX_DONT_SYNC | AT_NO_AUTOMOUNT;
     std::vector<OpenFile> found;
     struct statx wanted = {};
     if (::statx(descriptor, "", AT_EMPTY_PATH | kAsKnown, STATX_INO, &wanted) != 0)
         return found;
-    std::error_code ignored; // processes end while they are looked at
+    std::error_code ignored; // processes may end meanwhile
     for (const auto& process : std::filesystem::directory_iterator("/proc", ignored)) {
         const int id = std::atoi(process.path().filename().c_str());
         if (id <= 0 || id == ::getpid())

@@ -1,4 +1,4 @@
-// Who presents, holds and waits for files, in words.
+// Describes in words who presents, holds and awaits files.
 #pragma once
 
 #include "platform/FileCoordination.h"
@@ -6,21 +6,21 @@
 #include <optional>
 #include <string>
 
-/// The command name of a process; empty when the process is gone.
+/// The command name of a process; empty if the process is gone.
 std::string processName(int processID);
 
-/// Those that an access to the item waits for: "process 12 (bounce)", "processes 12 (bounce) and 34 (mixer)". When none
-/// is to be seen, "another process".
+/// Describes what an access to the item waits for: "process 12 (bounce)", "processes 12 (bounce) and 34 (mixer)", or
+/// "another process" if none is visible.
 std::string blockersText(const platform::CoordinatedItem& item, bool isWriting);
 
-/// Those that have locked the open file itself, as other programs do, though they know nothing of coordination:
-/// "process 12 (bounce), which has locked it for reading". When none is to be seen, "another process, which has locked
-/// it".
+/// Describes processes that have locked the open file itself, as programs do that know nothing of coordination:
+/// "process 12 (bounce), which has locked it for reading", or "another process, which has locked it" if none is
+/// visible.
 std::string lockersText(int descriptor);
 
-/// Lets the commands that this process will run know that it waits for them, with what it locks.
+/// Tells the commands that this process will run that it waits for them, and what it locks.
 void announceLock();
 
-/// What a `ktfiles lock` that runs this process has of the item: it waits for us, so that nobody here must wait for it.
-/// Of a lock for reading and one for writing, the latter.
+/// The lock on the item of a `ktfiles lock` that runs this process. It waits for us, so waiting for it would never end.
+/// If there are locks for reading and for writing, the latter.
 std::optional<platform::CoordinationParty> lockAbove(const platform::CoordinatedItem& item);

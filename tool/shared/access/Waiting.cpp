@@ -39,7 +39,7 @@ void awaitOthers(const std::string& path, const WaitOptions& options, const std:
     if (!platform::runInBackground([task] { (*task)(); })) {
         if (options.timeoutSeconds)
             throw Failure("no thread can be had to wait for others with a time limit");
-        (*task)(); // untold
+        (*task)(); // an exception is dropped
     }
     const auto isDoneBy = [&](Clock::time_point time) { return done.wait_until(time) == std::future_status::ready; };
     if (!options.quiet && start + kUntold < end && !isDoneBy(start + kUntold))

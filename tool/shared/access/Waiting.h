@@ -1,4 +1,4 @@
-// How the command waits for others: it says so when that lasts, and gives up when it was told to.
+// Waits for others, reports it if that takes long, and gives up after a timeout.
 #pragma once
 
 #include <functional>
@@ -6,23 +6,22 @@
 #include <string>
 
 struct WaitOptions {
-    /// For how long others are waited for, each time that they are in the way: 0 or more. Without it there is no limit.
+    /// How long to wait for others each time they are in the way: 0 or more. Unlimited if not set.
     std::optional<double> timeoutSeconds = std::nullopt;
-    bool quiet = false; // whether a wait of more than a second is kept from standard error
+    bool quiet = false; // does not report a wait of more than a second
 };
 
-/// Comes back when `wait`, which may block, has done so; throws what it throws. After a second it says on standard
-/// error what is waited for: `blockers` gives the words, "process 12 (bounce)". Throws Failure when the time is up.
-/// `wait` runs on another thread and then goes on there: it owns what it uses, and must give back what it gets too
-/// late.
+/// Returns when `wait`, which may block, has returned; throws what it throws. After a second it reports on standard
+/// error what is waited for; `blockers` describes it: "process 12 (bounce)". Throws Failure on a timeout. `wait` runs
+/// on another thread and then continues there, so it must own what it uses, and release what it acquires too late.
 void awaitOthers(const std::string& path, const WaitOptions& options, const std::function<std::string()>& blockers,
                  std::function<void()> wait);
 
-/// "ktfiles: FILE: waiting for process 12 (bounce) ...", on standard error.
+/// Prints "ktfiles: FILE: waiting for process 12 (bounce) ..." on standard error.
 void printWaiting(const std::string& path, const std::string& blockers);
 
-/// The words of a Failure: what an access that was waited for in vain still waits for.
+/// The text of a Failure: what the access still waits for after that time.
 std::string stillInUseText(const std::string& blockers, double seconds);
 
-/// Even what is free takes a moment to be had, from a presenter that has to answer: no wait is shorter, in seconds.
+/// Shortest wait in seconds: even a free item takes a moment if a presenter must answer.
 inline constexpr double kShortestWait = 0.1;

@@ -13,7 +13,7 @@
 
 namespace {
 
-/// A stretch of a file.
+/// A part of a file.
 class FileRangeStream : public platform::InputStream {
 public:
     FileRangeStream(CFileIO& file, std::int64_t begin, std::int64_t end) : file_(file), at_(begin), end_(end) {}
@@ -35,7 +35,7 @@ private:
     std::int64_t end_;
 };
 
-/// By its first bytes: a tag, or the mark of an encoding.
+/// Whether the first bytes are a tag, or the mark of an encoding.
 bool looksLikeXml(std::string_view head)
 {
     using namespace std::string_view_literals;
@@ -85,7 +85,7 @@ std::unique_ptr<platform::InputStream> AdmSource::stream()
 
 std::optional<Bytes> AdmSource::trackChunk()
 {
-    constexpr std::int64_t largest = 4 + 65535 * 40; // a header and as many entries as it counts
+    constexpr std::int64_t largest = 4 + 65535 * 40; // a header and the most entries that it can count
     const ChunkSurvey survey = isAudio_ ? surveyChunks(file_, fourCC("chna")) : ChunkSurvey();
     if (!survey.found)
         return std::nullopt;
@@ -105,7 +105,7 @@ bool AdmSource::isUTF16()
     return start == "\xFE\xFF"sv || start == "\xFF\xFE"sv || start == "<\0"sv || start == "\0<"sv;
 }
 
-/// In UTF-16 a zero byte may be half a character: what is left has an even size.
+/// In UTF-16 a zero byte may be half a character, so the remaining size is even.
 void AdmSource::dropTrailingNuls()
 {
     const std::int64_t end = end_;

@@ -1,4 +1,4 @@
-// Where the XML of an ADM document comes from: a file of its own, or the chunk "axml" of an audio file.
+// The XML of an ADM document, from a file of its own or from the chunk "axml" of an audio file.
 #pragma once
 
 #include "audiofile/CAudioFileIO.h"
@@ -9,24 +9,24 @@
 #include <optional>
 #include <string>
 
-/// An open file, read in pieces.
+/// An open file, read piece by piece.
 class AdmSource {
 public:
-    /// Whether a container may lack the chunk.
+    /// Whether a container without the chunk is accepted.
     enum class Document : bool { isThere, mayLack };
 
-    /// Throws Failure: also for what is neither XML nor a container, and for a container without the chunk.
+    /// Throws Failure, also if the file is neither XML nor a container, or a container without the chunk.
     explicit AdmSource(const std::string& path, Document document = Document::isThere);
 
     /// Whether the XML is a chunk of an audio file.
     bool isAudio() const { return isAudio_; }
-    /// False for a container that lacks it.
+    /// False if the container has no document.
     bool hasDocument() const { return end_ > begin_; }
     int channels() const { return file_.Info().channels; }
-    /// What there is of the body of the chunk "chna"; null where there is no such chunk.
+    /// The body of the chunk "chna", as far as the file holds it; null if there is no such chunk.
     std::optional<Bytes> trackChunk();
 
-    /// Bytes of XML. NUL bytes at the end, which some programs reserve in the chunk, do not count.
+    /// Size of the XML in bytes, without NUL bytes at the end, which some programs reserve in the chunk.
     std::int64_t size() const { return end_ - begin_; }
     /// Must not outlive the source.
     std::unique_ptr<platform::InputStream> stream();

@@ -5,7 +5,7 @@ std::string shortened(const std::string& text)
     std::size_t size = 200;
     if (text.size() <= size)
         return text;
-    while (size > 0 && (static_cast<unsigned char>(text[size]) & 0xC0) == 0x80) // never within a character
+    while (size > 0 && (static_cast<unsigned char>(text[size]) & 0xC0) == 0x80) // do not cut a character
         --size;
     return text.substr(0, size) + "…";
 }

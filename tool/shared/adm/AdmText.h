@@ -4,8 +4,7 @@
 #include <string>
 #include <string_view>
 
-/// The start of a very long text, for one that is told again and again: of names of 16 KB a small document could make
-/// gigabytes.
+/// The start of a very long text. A small document could otherwise produce gigabytes by repeating names of 16 KB.
 std::string shortened(const std::string& text);
 
 /// "1 object", "4,000 objects".

@@ -16,7 +16,7 @@ namespace {
 
 constexpr const char* kTrackMismatch = "TrackMismatch";
 
-/// IDs are hexadecimal, in upper or lower case.
+/// IDs are hexadecimal in upper or lower case.
 std::string folded(std::string_view id)
 {
     std::string text(id);
@@ -24,8 +24,8 @@ std::string folded(std::string_view id)
     return text;
 }
 
-/// One entry of the chunk "chna" (ITU-R BS.2088), 40 bytes, little-endian: the track from 1 on, then texts of a fixed
-/// size, filled up with zeros.
+/// One entry of the chunk "chna" (ITU-R BS.2088), 40 bytes, little-endian: the track, counted from 1, then texts of
+/// fixed size, padded with zeros.
 struct TrackEntry {
     unsigned track = 0;
     std::string uid, format, pack;
@@ -49,7 +49,7 @@ public:
         std::size_t uncounted = 0;
         for (std::size_t i = 0; i < room; ++i) {
             const TrackEntry entry = entryAt(chunk.subspan(headerSize + i * entrySize, entrySize));
-            if (entry.track == 0) // not in use
+            if (entry.track == 0) // unused
                 continue;
             used.insert(entry.track);
             if (i < uids)
@@ -74,7 +74,7 @@ public:
                 tell(fmt::format("'{}' is not in the chunk \"chna\"", shortened(track.audioTrackUIDID())), &track);
                 continue;
             }
-            // The reference to a track is that of a track format, or of a channel format with "_00" behind it.
+            // Tracks refer to a track format, or to a channel format with "_00" appended.
             std::string_view format = entry->second.format;
             if (track.audioTrackFormatIDRef())
                 compare(track, *track.audioTrackFormatIDRef(), format);
@@ -123,7 +123,7 @@ private:
 
     int channels_;
     std::vector<ADMDiagnostic>& problems_;
-    std::map<std::string, TrackEntry> entries_; // by UID, in lower case
+    std::map<std::string, TrackEntry> entries_; // by UID in lower case
 };
 
 } // namespace

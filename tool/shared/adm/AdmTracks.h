@@ -1,4 +1,4 @@
-// What the chunk "chna" (ITU-R BS.2088) of an audio file says of its tracks, against its channels and its ADM document.
+// Checks the chunk "chna" (ITU-R BS.2088) of an audio file against its channels and its ADM document.
 #pragma once
 
 #include "adm/ADMDocument.h"
@@ -6,6 +6,6 @@
 
 #include <vector>
 
-/// `document` is the source's, read to its end; null where there is none: tracks may be of common definitions alone.
-/// Also that there are tracks and no "chna". Throws Failure.
+/// `document` is the source's, read to its end, or null if there is none: tracks may use only common definitions.
+/// Reports tracks without a "chna" too. Throws Failure.
 std::vector<ADMDiagnostic> trackProblems(AdmSource& source, const ADMDocument* document);

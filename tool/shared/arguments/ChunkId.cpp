@@ -4,7 +4,7 @@
 
 namespace {
 
-// The byte that `text` begins with, and the text shortened by it.
+// Takes the first byte off `text`.
 std::optional<unsigned char> takeByte(std::string_view& text)
 {
     constexpr std::size_t kEscapeLength = 4;

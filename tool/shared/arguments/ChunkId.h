@@ -1,4 +1,4 @@
-// Chunk ids as people write them: the form in which the command prints them, and shorter.
+// Parses chunk ids as the command prints them, and shorter forms.
 #pragma once
 
 #include "platform/core/FourCC.h"
@@ -6,6 +6,6 @@
 #include <optional>
 #include <string_view>
 
-/// One to four characters of printable ASCII, or `\xNN` for any byte; padded with spaces to four, so that "fmt" is
-/// "fmt ". None for anything else. Reads back what fourCCText writes.
+/// One to four characters of printable ASCII, or `\xNN` for any byte; padded with spaces to four, so "fmt" is "fmt ".
+/// None for anything else. Accepts everything that fourCCText writes.
 std::optional<FourCC> chunkIdFromText(std::string_view text);

@@ -74,7 +74,7 @@ std::multimap<int, RegisteredVerb>& registeredVerbs()
     return verbs;
 }
 
-// The parser's own words with its own names of things put into ours.
+// Replaces the parser's names of things by ours in its messages.
 std::string usageMessage(const UsageError& error)
 {
     std::string message = printableOnError(error.what());
@@ -84,7 +84,7 @@ std::string usageMessage(const UsageError& error)
     return message;
 }
 
-// The verb that the arguments begin with and its object, each with a space ahead.
+// The verb and object that the arguments begin with, each after a space.
 std::string verbsIn(const std::vector<std::string>& arguments, const Verb& program)
 {
     std::string words;

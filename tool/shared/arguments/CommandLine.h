@@ -20,34 +20,35 @@ class CommandLine {
 public:
     CommandLine();
 
-    /// A verb, or with `parent` an object of one. `run` does the work after parsing and tells whether all went well; it
-    /// may throw a UsageError for a combination of arguments that makes no sense.
+    /// Adds a verb, or with `parent` an object of one. `run` does the work after parsing and returns whether it
+    /// succeeded; it may throw UsageError for a combination of arguments that makes no sense.
     Verb& addVerb(const std::string& name, const std::string& description, Verb::Work run, Verb* parent = nullptr);
     const OutputOptions& output() const { return output_; }
 
-    // Arguments that verbs have in common. The values must outlive the parsing.
+    // Arguments that verbs share. The values must outlive the parsing.
     static Argument addFile(Verb& verb, std::string& file, const std::string& name = "FILE");
-    /// Also "-", for standard input.
+    /// Accepts "-" for standard input.
     static Argument addFileOrInput(Verb& verb, std::string& file);
     static Argument addFiles(Verb& verb, std::vector<std::string>& files, const std::string& name = "FILE");
-    /// Also folders, and lists by the options --files-from and -0. That there is a name at all is seen by `allNames`.
+    /// Accepts folders too, and lists with the options --files-from and -0. `allNames` checks that there is at least
+    /// one name.
     static Argument addFiles(Verb& verb, FileArguments& files, const std::string& name = "FILE");
-    /// Also "-", for standard input.
+    /// Accepts "-" for standard input too.
     static Argument addFilesOrInput(Verb& verb, FileArguments& files);
     static void addFileList(Verb& verb, FileArguments& files);
-    /// "--csv", of verbs whose records are flat.
+    /// "--csv", for verbs whose records are flat.
     Argument addCsv(Verb& verb);
     static Argument addChunkId(Verb& verb, FourCC& id);
     /// An option whose value names a file; "-" stands for standard input or output.
     static Argument addPath(Verb& verb, const std::string& name, std::string& path, const std::string& description);
-    /// "--force", of verbs that write files of the user's choice.
+    /// "--force", for verbs that write files of the user's choice.
     static void addForceOption(Verb& verb, OutputFile::Existing& existing);
     static void addEditOptions(Verb& verb, EditOptions& options);
 
-    /// The exit status when the verb's work tells that not all went well, in the place of kExitFailed.
+    /// Sets the exit status for work that did not succeed, in place of kExitFailed.
     void setFailureStatus(int status) { failureStatus_ = status; }
 
-    /// Parses and does what is asked; the exit status of the process.
+    /// Parses the arguments and runs the verb; returns the exit status of the process.
     int run(int argc, char** argv);
 
 private:
@@ -63,12 +64,12 @@ private:
     std::vector<std::string> helpTopics_;
 };
 
-/// Joins the list of verbs from a file of their own: `const VerbRegistration registration{10, "info", declareInfo};`
+/// Adds a verb to the list from its own file: `const VerbRegistration registration{10, "info", declareInfo};`
 class VerbRegistration {
 public:
     /// `rank` orders the verbs in the help. `declare` adds the verb under its name.
     VerbRegistration(int rank, const char* name, void (*declare)(CommandLine&));
-    /// The verb of that name alone, since declaring all takes a third of the time of a short run; all of them when
-    /// there is none.
+    /// Declares only the verb with that name, because declaring all takes a third of the time of a short run; all of
+    /// them if there is none.
     static void declareNamed(CommandLine& commandLine, std::string_view name);
 };

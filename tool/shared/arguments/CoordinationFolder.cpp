@@ -22,7 +22,8 @@ void useCoordinationFolderOfEnvironment()
 void addCoordinationFolder(Verb& verb)
 {
     const auto useFolder = [](const std::string& folder) {
-        std::error_code error; // of a working folder that is gone: the access then says what is wrong
+        // Set if the working folder is gone; the access then reports what is wrong.
+        std::error_code error;
         const std::string absolute = std::filesystem::absolute(folder, error).string();
         ::setenv(kVariable, absolute.c_str(), 1);
         platform::FileCoordinator::setCoordinationFolder(error ? folder : absolute);

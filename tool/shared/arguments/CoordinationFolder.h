@@ -1,10 +1,10 @@
-// The folder in which this command and other programs meet to coordinate, when the user chooses it.
+// The user's choice of the folder in which this command and other programs coordinate.
 #pragma once
 
 #include "tool/shared/arguments/Verb.h"
 
-/// KTFILES_COORDINATION, an absolute path; the library itself looks at no environment.
+/// Uses KTFILES_COORDINATION, an absolute path; the library itself ignores the environment.
 void useCoordinationFolderOfEnvironment();
 
-/// --coordination FOLDER, which also counts for the commands that a verb runs.
+/// Adds --coordination FOLDER, which also applies to the commands that a verb runs.
 void addCoordinationFolder(Verb& verb);

@@ -9,7 +9,7 @@
 
 namespace {
 
-/// Letters to add, to drop or to change (Levenshtein), without regard to case.
+/// The number of letters to add, drop or change (Levenshtein distance), ignoring case.
 std::size_t distanceOf(std::string_view a, std::string_view b)
 {
     std::vector<std::size_t> row(b.size() + 1);

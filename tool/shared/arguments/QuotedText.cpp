@@ -19,7 +19,7 @@ struct Escape {
 };
 constexpr Escape kEscapes[] = {{'\\', '\\'}, {'\'', '\''}, {'n', '\n'}, {'t', '\t'}, {'r', '\r'}, {'"', '"'}};
 
-/// Takes what follows a backslash.
+/// Reads the rest of an escape, after its backslash.
 char takeEscape(std::string_view& text)
 {
     const char letter = text.empty() ? '\0' : text.front();

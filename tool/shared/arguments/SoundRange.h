@@ -1,4 +1,4 @@
-// The options by which verbs take a part of the sound, the same in all of them.
+// The options that select a part of the sound, the same for all verbs.
 #pragma once
 
 #include "tool/shared/output/ClockTime.h"
@@ -7,12 +7,12 @@
 
 class Verb;
 
-/// Where the values go.
+/// Receivers of the values.
 struct SoundRangeTakers {
     std::function<void(const SoundLength&)> start, end, frames;
 };
 
-/// --start, and either --end or --frames.
+/// Adds --start, and either --end or --frames.
 void addSoundRange(Verb& verb, const SoundRangeTakers& takers);
-/// Throws UsageError when both are of one kind and the end is not behind the start.
+/// Throws UsageError if both are of one kind and the end is not after the start.
 void requireOrder(const SoundLength& start, const std::optional<SoundLength>& end);

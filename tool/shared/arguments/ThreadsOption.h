@@ -1,9 +1,9 @@
-// The option -j, as every verb has it that works on several files at once.
+// The option -j of verbs that process several files at once.
 #pragma once
 
 class Verb;
 
-/// 1 to 256; what is not given stays 0.
+/// 1 to 256; remains 0 if not given.
 void addThreads(Verb& verb, unsigned& threads);
-/// That many, or for 0 one per core.
+/// The number itself, or one thread per core for 0.
 unsigned threadsFor(unsigned asked);

@@ -1,4 +1,4 @@
-// The option --timeout, as every verb that waits for others has it.
+// The option --timeout of verbs that wait for others.
 #pragma once
 
 #include "tool/shared/arguments/Verb.h"
@@ -6,6 +6,6 @@
 #include <optional>
 #include <string>
 
-/// Seconds, 0 to three years; anything else, "nan" and "inf" too, is a mistake on the command line.
+/// Seconds from 0 to three years; anything else, including "nan" and "inf", is a usage error.
 void addTimeout(Verb& verb, std::optional<double>& seconds,
                 const std::string& description = "Give up when others are in the way for that long: exit status 1");

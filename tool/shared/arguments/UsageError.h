@@ -4,13 +4,13 @@
 #include <stdexcept>
 #include <string>
 
-/// What is wrong with the arguments, in words for people. Whoever throws it has changed nothing yet.
+/// The text says what is wrong with the arguments. Nothing has been changed when it is thrown.
 class UsageError : public std::runtime_error {
 public:
     using std::runtime_error::runtime_error;
 };
 
-/// An argument that must be given is not.
+/// A required argument is missing.
 class MissingArgument : public UsageError {
 public:
     explicit MissingArgument(const std::string& name) : UsageError(name + " is required") {}

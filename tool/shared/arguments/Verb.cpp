@@ -11,7 +11,7 @@
 
 namespace {
 
-// The parser takes a value "[a,b]" apart as a list, but it is a fine file name: this hides the bracket from it.
+// The parser splits a value "[a,b]" as a list, although it may be a file name; this hides the bracket from it.
 constexpr char kBracketGuard = '\x01';
 
 std::string guarded(const std::string& argument)
@@ -31,10 +31,10 @@ CLI::Option* unguarding(CLI::Option* option, TextCheck check = {})
     return option->transform(CLI::Validator(unguard, ""));
 }
 
-// The group of options that are words for another program, behind "--".
+// The option group of words for another program, which follow "--".
 constexpr const char* kWordsGroup = "Words";
 
-/// Help in the words of the grammar: one usage line for a verb, and one for each of its objects.
+/// Formats the help: one usage line for a verb, and one for each of its objects.
 class HelpFormatter : public CLI::Formatter {
 public:
     HelpFormatter()
@@ -56,7 +56,7 @@ public:
     {
         std::string help = CLI::Formatter::make_help(app, std::move(name), mode);
         if (const std::size_t gap = help.find("\n\n\n"); gap != help.npos)
-            help.erase(gap, 1); // the group of words lists nothing, and has an empty line in front all the same
+            help.erase(gap, 1); // the group of words lists nothing but has an empty line before it
         return fitted(help);
     }
 
@@ -68,7 +68,7 @@ public:
         return names;
     }
 
-    /// What an option goes with is in its description.
+    /// Omits which options exclude each other, because the descriptions say so.
     std::string make_option_opts(const CLI::Option* option) const override
     {
         const std::string text = CLI::Formatter::make_option_opts(option);
@@ -150,7 +150,7 @@ Verb::Verb(std::shared_ptr<CLI::App> app, Work work) : app_(std::move(app)), wor
 
 Verb& Verb::addVerb(const std::string& name, const std::string& description, Work work)
 {
-    const std::shared_ptr<CLI::App> below(app_, app_->add_subcommand(name, description)); // which this one owns
+    const std::shared_ptr<CLI::App> below(app_, app_->add_subcommand(name, description)); // owned by this verb
     return *verbs_.emplace_back(new Verb(below, std::move(work)));
 }
 
@@ -207,7 +207,7 @@ Argument Verb::addNumber(const std::string& names, TakeNumber take, std::pair<lo
 
 Verb::Request Verb::parse(const std::vector<std::string>& arguments)
 {
-    std::vector<std::string> reversed; // as the parser takes them
+    std::vector<std::string> reversed; // the order that the parser expects
     std::transform(arguments.rbegin(), arguments.rend(), std::back_inserter(reversed), guarded);
     try {
         app_->parse(std::move(reversed));
@@ -250,7 +250,7 @@ const Verb* Verb::find(const std::string& name) const
 
 std::string Verb::help(const std::string& above) const
 {
-    // Not by the parser's own, which gives that of a verb in the arguments: of "help" itself.
+    // The parser's own function would return the help of a verb in the arguments, such as "help" itself.
     const std::string name = above.empty() ? app_->get_name() : above + " " + app_->get_name();
     return app_->get_formatter()->make_help(app_.get(), name, CLI::AppFormatMode::Normal);
 }

@@ -1,5 +1,4 @@
-// A verb of the command as the parser knows it: its options, its arguments by position, its help, and the verbs below
-// it. Nothing else knows the parser.
+// A verb of the command: its options, positional arguments, help, and the verbs below it. Nothing else uses the parser.
 #pragma once
 
 #include <functional>
@@ -15,14 +14,14 @@ class App;
 class Option;
 } // namespace CLI
 
-/// One option, or one argument by position, while it is declared.
+/// One option or positional argument while it is declared.
 class Argument {
 public:
     Argument& required();
-    /// Stands for the value in the help.
+    /// Sets the placeholder for the value in the help.
     Argument& label(const std::string& text);
     Argument& describe(const std::string& text);
-    /// The two cannot be given together.
+    /// Forbids giving both arguments.
     Argument& excludes(const Argument& other);
 
 private:
@@ -32,7 +31,7 @@ private:
     CLI::Option* option_;
 };
 
-/// What is wrong with a text; empty when nothing is.
+/// What is wrong with a text; empty if nothing is.
 using TextCheck = std::function<std::string(const std::string& text)>;
 
 class Verb {
@@ -46,14 +45,14 @@ public:
     Verb(const Verb&) = delete;
     Verb& operator=(const Verb&) = delete;
 
-    /// A verb below this one. `work` tells whether all went well.
+    /// Adds a verb below this one. `work` returns whether it succeeded.
     Verb& addVerb(const std::string& name, const std::string& description, Work work);
-    /// The last lines of the help.
+    /// Sets the last lines of the help.
     void setFooter(const std::string& text);
-    /// The heading in the help under which what is added from now on stands; at first "Options".
+    /// Sets the heading in the help for what is added from now on; initially "Options".
     void setHeading(const std::string& text);
 
-    // Options have `names` such as "-q,--quiet", arguments by position one such as "FILE". References must outlive the
+    // Options have `names` such as "-q,--quiet", positional arguments one such as "FILE". References must outlive the
     // parsing.
 
     Argument addFlag(const std::string& names, bool& value, const std::string& description);
@@ -63,12 +62,12 @@ public:
                      TextCheck check = {});
     Argument addTexts(const std::string& names, std::vector<std::string>& values, const std::string& description,
                       TextCheck check = {});
-    /// Texts that are another program's business; they come last, behind "--".
+    /// Adds words for another program; they come last, after "--".
     Argument addWords(const std::string& name, std::vector<std::string>& words, const std::string& description);
-    /// Least and most in `range`; "N" in the help.
+    /// `range` is the smallest and the largest value; "N" in the help.
     Argument addNumber(const std::string& names, TakeNumber take, std::pair<long, long> range,
                        const std::string& description);
-    /// The same into a number, or an optional one.
+    /// As above, stored in a number or an optional one.
     template <class Number>
         requires(!std::is_invocable_v<Number, long>)
     Argument addNumber(const std::string& names, Number& value, std::pair<long, long> range,
@@ -83,23 +82,23 @@ public:
         return addNumber(names, TakeNumber(take), range, description);
     }
 
-    /// What a command line asks for: the work of a verb, or, when `verb` is null, that `text` be printed.
+    /// The result of parsing: the work of a verb, or if `verb` is null, a `text` to print.
     struct Request {
         const Verb* verb = nullptr;
         std::string text;
     };
-    /// Sets what the arguments say. The verb is this one when none is named. Throws UsageError.
+    /// Sets the values that the arguments give. The verb is this one if none is named. Throws UsageError.
     Request parse(const std::vector<std::string>& arguments);
 
-    /// Whether the option was in the arguments.
+    /// Whether the option was given.
     bool isGiven(const std::string& name) const;
     bool work() const { return work_(); }
     const std::string& name() const;
-    /// The verb of that name below this one, or null.
+    /// The verb of that name below this one; null if there is none.
     const Verb* find(const std::string& name) const;
-    /// Those below this one.
+    /// Names of the verbs below this one.
     std::vector<std::string_view> names() const;
-    /// `above` are the names ahead of this verb's.
+    /// `above` are the names that precede this verb's.
     std::string help(const std::string& above = "") const;
 
 private:

@@ -97,7 +97,7 @@ ChunkSurvey surveyChunks(CAudioFileIO& file, FourCC id)
     ChunkSurvey survey;
     const ContainerProblem problem = SurveyChunks(file, id, survey);
     if (problem.kind == ContainerProblem::Kind::chunks)
-        requireNone(SoundProblem(file)); // says best what is wrong with it
+        requireNone(SoundProblem(file)); // knows best what is wrong with it
     requireNone(problem);
     return survey;
 }

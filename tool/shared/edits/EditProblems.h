@@ -1,4 +1,4 @@
-// What the library tells of edits that cannot be made, in the command's words.
+// The command's words for edits that cannot be made.
 #pragma once
 
 #include "audiofile/ChunkSurvey.h"
@@ -8,19 +8,20 @@
 #include <optional>
 #include <string>
 
-/// Throw the Failure of a problem, if it is one.
+/// Throws the Failure of a problem, if there is one.
 void requireNone(const FileProblem& problem);
 void requireNone(const ContainerProblem& problem);
 
-/// SurveyChunks, and the problem thrown.
+/// SurveyChunks; throws a problem.
 ChunkSurvey surveyChunks(CAudioFileIO& file, FourCC id);
-/// The same of the container at the path, which is opened for it.
+/// As above for the container at the path, which is opened.
 ChunkSurvey surveyOf(const std::string& path, FourCC id);
 
-/// Why a chunk should not be added, and what would be lost; none when nothing speaks against it. Throws Failure when
+/// The reason not to add a chunk, and what would be lost; none if there is none. Throws Failure if the container cannot
+/// be walked.
 /// the container cannot be walked.
 std::optional<std::string> objectionToAdding(CAudioFileIO& file, const ChunkSurvey& survey, FourCC id);
-/// The same for removing every chunk of the id.
+/// As above, for removing every chunk with the id.
 std::optional<std::string> objectionToRemoving(const ChunkSurvey& survey, FourCC id);
 
 /// Commits an open file, or the folder that holds the path, to storage. Throws Failure.

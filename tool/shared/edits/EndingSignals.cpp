@@ -15,9 +15,9 @@
 namespace {
 
 std::atomic<bool> isEnding = false;
-std::atomic<int> beingMade = 0; // temporary files, by other threads
+std::atomic<int> beingMade = 0; // temporary files that other threads are making
 
-// One of two that are written in turns, so that the handler finds a whole one whenever it comes.
+// Two buffers are written in turn, so that the handler always finds a complete one.
 struct LastWords {
     std::array<char, 4096> text;
     std::size_t size = 0;
@@ -27,7 +27,7 @@ std::atomic<const LastWords*> wordsToSay = nullptr;
 static_assert(std::atomic<const LastWords*>::is_always_lock_free);
 static_assert(std::atomic<int>::is_always_lock_free && std::atomic<bool>::is_always_lock_free);
 
-// A thread that makes one for longer than half a second has a disk that will not keep it either.
+// Gives up after half a second: a disk that slow will not keep the file either.
 void awaitThoseBeingMade()
 {
     constexpr timespec moment{0, 1'000'000};

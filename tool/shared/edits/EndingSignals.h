@@ -1,19 +1,19 @@
-// What happens to half-done files when a signal ends the command.
+// Cleans up unfinished files when a signal ends the command.
 #pragma once
 
 #include "platform/SignalHold.h"
 
 #include <string>
 
-/// From now on SIGINT, SIGTERM, SIGHUP and their like remove the temporary files of this process before they end it.
-/// Ahead of making one.
+/// Makes SIGINT, SIGTERM, SIGHUP and similar signals remove this process's temporary files before they end it. Call
+/// before making one.
 void removeTemporaryFilesAtEndingSignals();
 
-/// From now on such a signal writes the text to standard error, ahead of the end; empty: nothing more.
+/// Sets a text that such a signal writes to standard error before the end; empty for none.
 void sayAtEndingSignals(const std::string& text);
 
-/// For as long as it lives a thread makes a temporary file: a signal waits for that, and when one has come the thread
-/// stands still, so that no file is made behind the back of those that are removed.
+/// A thread is making a temporary file during the lifetime of this object. A signal waits for it; once a signal has
+/// arrived, the thread blocks, so that no file is made after the others are removed.
 class BeforeTheEnd {
 public:
     BeforeTheEnd();
@@ -22,5 +22,6 @@ public:
     BeforeTheEnd& operator=(const BeforeTheEnd&) = delete;
 
 private:
-    const platform::SignalHold hold_; // or the handler would wait for the thread that it runs in
+    // Otherwise the handler would wait for the thread that it runs in.
+    const platform::SignalHold hold_;
 };

@@ -25,7 +25,7 @@ namespace {
     throw Failure(out + " exists; --force replaces it");
 }
 
-// Can only be asked for by being changed, which other threads must not see.
+// The mask can only be read by changing it, which other threads must not notice.
 mode_t creationMask()
 {
     static const mode_t mask = [] {
@@ -89,8 +89,7 @@ void OutputFile::write(std::string_view bytes)
     }
 }
 
-/// The disk works while the rest is made, so that the commit at the end waits for little. What it cannot write is told
-/// by that commit.
+/// Starts writing to the disk early, so that the commit at the end is quick. The commit reports errors.
 void OutputFile::letTheDiskBegin(std::size_t written)
 {
     constexpr std::int64_t worthIt = 8 << 20;
@@ -151,7 +150,7 @@ platform::OwnedDescriptor OutputFile::openReplaced() const
 void OutputFile::publish()
 {
     const FileProblem problem = file_->Publish(target_);
-    if (problem.kind == FileProblem::Kind::system && problem.systemError == EEXIST) // it came meanwhile
+    if (problem.kind == FileProblem::Kind::system && problem.systemError == EEXIST) // created meanwhile
         failSinceItExists(out_);
     requireNone(problem);
 }
@@ -163,13 +162,13 @@ void OutputFile::takePlaceOf(const platform::OwnedDescriptor& replaced)
     if (!platform::systemCalls().status(replaced.get(), &status) ||
         !platform::fileAttributes(replaced.get(), attributes))
         failToWrite(errno);
-    // Not in the place of one that has other names, or an owner that we cannot give it.
+    // Writes into a file that has other names, or an owner that the new file cannot get, instead of replacing it.
     if (status.links > 1 || CopyFileAttributes(replaced.get(), attributes, file_->Descriptor(), KeptTimes::accessOnly))
         return writeInto(replaced);
     requireNone(file_->Replace());
 }
 
-// Room is made sure of while the old content is still there.
+// Reserves the room while the old content is still there.
 void OutputFile::writeInto(const platform::OwnedDescriptor& replaced)
 {
     struct stat status = {};

@@ -16,7 +16,7 @@ constexpr Word containers[] = {
     {kRIFF, "WAVE"},
     {kCaff, "CAF"},
     {kCAT, "REX2"},
-    {fourCC("WAVE"), "WAVE"}, // behind a tag
+    {fourCC("WAVE"), "WAVE"}, // after a tag
     {fourCC("RIFX"), "WAVE"}, // big-endian
     {fourCC("W64f"), "Wave64"},
     {fourCC("NeXT"), "AU"},
@@ -68,7 +68,7 @@ constexpr Word containers[] = {
     {fourCC("nist"), "NIST SPHERE"},
 };
 
-// Those of WAVE by their registered numbers (RFC 2361 and its successors).
+// WAVE's formats by their registered numbers (RFC 2361 and its successors).
 constexpr FourCC tagged(FourCC number)
 {
     return fourCC('m', 's', 0, 0) | number;
@@ -108,7 +108,7 @@ constexpr std::pair<CodingProfile, const char*> profiles[] = {
     {CodingProfile::dtsHDMaster, "DTS-HD MA"}, {CodingProfile::dtsExpress, "DTS Express"},
 };
 
-// By the speakers' bits; those behind and those beside the listener are called alike.
+// By the speakers' bits; speakers behind and beside the listener have the same names.
 constexpr std::pair<std::uint32_t, const char*> layouts[] = {
     {0x4, "mono"},      {0x3, "stereo"},     {0xB, "2.1"},       {0x7, "3.0"},       {0x103, "3.0 (back)"},
     {0xF, "3.1"},       {0x33, "quad"},      {0x603, "quad"},    {0x107, "4.0"},     {0x10F, "4.1"},
@@ -168,8 +168,8 @@ std::string layoutWord(const AudioFileInfo& info)
     return words;
 }
 
-// Decoders give channels in the order of the mask, and WAVE has them so; other containers of linear PCM have an order
-// of their own, of which the mask does not tell.
+// Decoders deliver channels in the order of the mask, and WAVE stores them so; other containers of linear PCM have
+// their own order, which the mask does not tell.
 std::vector<std::string> channelWords(const AudioFileInfo& info)
 {
     const bool isInOrder = info.compressed || info.fileType == kWAVE;
@@ -194,7 +194,7 @@ std::string formatWords(const AudioFileInfo& info)
         return fmt::format("{}{:.10g} MHz", coding == "DSD" ? "DSD " : coding + " DSD ",
                            static_cast<double>(info.dsdRate) / 1e6);
     }
-    if (info.compressed && info.formatCode == fourCC("lpcm") && info.sourceBits > 0) // behind a tag
+    if (info.compressed && info.formatCode == fourCC("lpcm") && info.sourceBits > 0) // after a tag
         return fmt::format("{}-bit", info.sourceBits);
     if (info.compressed)
         return info.sourceBits > 0 ? fmt::format("{} {}-bit", codingWord(info), info.sourceBits) : codingWord(info);

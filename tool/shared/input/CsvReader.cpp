@@ -25,7 +25,7 @@ std::optional<CsvRow> CsvReader::next()
         row.cells.push_back(takeCell());
         if (text_.empty() || takeLineEnd())
             return row;
-        text_.remove_prefix(1); // the separator
+        text_.remove_prefix(1); // skips the separator
     }
 }
 

@@ -1,4 +1,4 @@
-// Reads comma-separated values (RFC 4180), as spreadsheets write them too.
+// Reads comma-separated values (RFC 4180) as spreadsheets write them.
 #pragma once
 
 #include <cstddef>
@@ -8,19 +8,18 @@
 #include <vector>
 
 struct CsvRow {
-    std::size_t line = 0; // on which it begins, counted from 1
+    std::size_t line = 0; // where it begins, counted from 1
     std::vector<std::string> cells;
 };
 
-/// Lines end with CRLF, LF or CR. A cell that begins with a quotation mark ends with one, and has two for each in it;
-/// marks elsewhere are characters like any other.
+/// Lines end with CRLF, LF or CR. A cell that begins with a quotation mark ends with one, and doubles those inside; in
+/// other cells they are ordinary characters.
 class CsvReader {
 public:
-    /// The text must outlive this; a byte order mark ahead of it is passed over.
+    /// The text must outlive this; skips a byte order mark.
     CsvReader(std::string_view text, char separator);
 
-    /// None at the end; lines with nothing on them are passed over. Throws Failure for quotation marks that do not
-    /// match.
+    /// None at the end; skips empty lines. Throws Failure for unbalanced quotation marks.
     std::optional<CsvRow> next();
 
 private:

@@ -16,21 +16,21 @@
 
 namespace {
 
-// A list may come from a pipe that never ends a line: no path is that long.
+// A list may come from a pipe that never ends a line; no path is that long.
 constexpr std::size_t kLongestName = 1 << 16;
 
 void addName(std::vector<std::string>& names, std::string_view name)
 {
     if (name.size() > kLongestName)
         throw Failure("is no list of files: a name has more than 65536 bytes");
-    if (!name.empty()) // which may be called "-", as a file
+    if (!name.empty()) // here "-" is a file's name
         names.push_back(name == kStandardInput ? "./-" : nameMeantBy(std::string(name)));
 }
 
 void addListed(std::vector<std::string>& names, int descriptor, char separator)
 {
     std::array<char, 1 << 16> piece;
-    std::string begun; // a name whose end has not come
+    std::string begun; // an incomplete name
     for (;;) {
         const ssize_t got = ::read(descriptor, piece.data(), piece.size());
         if (got < 0 && errno == EINTR)

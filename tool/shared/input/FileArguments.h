@@ -1,4 +1,4 @@
-// What stands where the grammar has FILE...: files, folders for the audio files below them, and lists of both.
+// The files that stand for FILE... in the grammar: files, folders with audio files, and lists of both.
 #pragma once
 
 #include <string>
@@ -6,23 +6,23 @@
 
 struct FileArguments {
     std::vector<std::string> names;
-    std::string list;            // a file of further names, "-" for standard input; empty: none
-    bool isNulSeparated = false; // the names in the list; else one stands on a line
+    std::string list;            // a file with further names, "-" for standard input; empty if none
+    bool isNulSeparated = false; // of names in the list; otherwise one per line
 
-    std::string label = "FILE"; // what the grammar calls them
-    bool takesInput = false;    // "-" for standard input
-    bool takesFolders = true;   // else they are files like any other, which are refused when they are opened
+    std::string label = "FILE"; // their name in the grammar
+    bool takesInput = false;    // accepts "-" for standard input
+    bool takesFolders = true;   // otherwise folders are refused when they are opened
 
-    /// What messages about the list call it.
+    /// The list's name in messages.
     std::string listName() const { return list == "-" ? "standard input" : list; }
-    /// Whether more files than one may come, so that each line says which it is about.
+    /// Whether there may be several files, so that each line must name its file.
     bool maybeSeveral() const;
 };
 
 /// Throws UsageError for "-".
 void requireNoInput(const std::string& name);
 
-/// The names on the command line, and then those of the list. Throws MissingArgument when there is neither, and
-/// Failure, which is about the list, for one that cannot be read or names no file. UsageError for "-" where that
-/// is not taken, or is the list already.
+/// The names on the command line, followed by those in the list. Throws MissingArgument if there are neither, Failure,
+/// which concerns the list, if it cannot be read or names no file, and UsageError for "-" if that is not accepted or is
+/// the list already.
 std::vector<std::string> allNames(const FileArguments& files);

@@ -11,19 +11,19 @@
 
 namespace {
 
-constexpr std::size_t kFilesPerThread = 64; // that wait, or whose results do
+constexpr std::size_t kFilesPerThread = 64; // waiting, or with results waiting
 
-/// False when no more is wanted.
+/// False if no more is wanted.
 using Visit = std::function<bool(FoundFile file)>;
 /// Visits all files; may be called twice.
 using Walk = std::function<void(const Visit& visit)>;
 
-/// What the first half of the work came to.
+/// The result of the first half of the work.
 struct Answer {
     FoundFile file;
     FileRest rest;
     std::exception_ptr problem;
-    double parts = 0; // of the work that progress has heard of
+    double parts = 0; // of the work already reported to progress
 };
 
 class FileWork {
@@ -50,10 +50,10 @@ public:
     void fail(const std::string& path, const std::string& text)
     {
         note(path, text);
-        Output::standard().flush(); // what was told so far comes first
+        Output::standard().flush(); // so that earlier output comes first
         reportFailure(path, text);
     }
-    /// Nothing was there: neither a file to work on nor one that failed.
+    /// Reports that there was nothing: no file to work on and none that failed.
     void tellIfNone(const std::string& folder) const
     {
         if (!hasAny_ && !loop_.quiet && !Output::standard().failed())
@@ -62,7 +62,7 @@ public:
     bool isGood() const { return isGood_; }
 
 private:
-    /// False when there is no thread for it.
+    /// False if no thread could be started.
     bool runByThreads(const Walk& walk, unsigned threads)
     {
         OrderedWork<FoundFile, Answer> work(threads, std::size_t{threads} * kFilesPerThread,
@@ -73,7 +73,8 @@ private:
         });
         if (!walker.joinable())
             return false;
-        struct Stopping { // ahead of waiting for the walker, also when there is no memory left
+        // Declared so as to run before the wait for the walker, even if memory is short.
+        struct Stopping {
             decltype(work)& stopped;
             ~Stopping() { stopped.stop(); }
         } const stopping{work};
@@ -121,7 +122,7 @@ private:
                 fail(path, failure.what());
         }
         if (sharesTerminal_)
-            Output::standard().flush(); // ahead of the next line of progress
+            Output::standard().flush(); // before the next line of progress
         progress_.advance(1, answer.parts + FilesProgress::takeParts());
         return !Output::standard().failed();
     }

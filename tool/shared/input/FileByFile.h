@@ -1,4 +1,4 @@
-// What the verbs that tell of several files have in common: the walk over them, by several threads, in their order.
+// Processes several files for a verb, on several threads, with results in order.
 #pragma once
 
 #include "tool/shared/input/FileArguments.h"
@@ -10,34 +10,34 @@
 #include <memory>
 #include <vector>
 
-/// How files are gone through.
+/// How the files are processed.
 struct FileLoop {
     unsigned threads = 1;          // 0: one per core
-    const char* doing = "reading"; // for people who wait
+    const char* doing = "reading"; // shown while people wait
     bool quiet = false;
 };
 
-/// The second half of the work on a file, which tells of the first: in the order of the files, by the thread that
-/// called. Throws Failure.
+/// The second half of the work on a file, which reports the first: in the order of the files, on the calling thread.
+/// Throws Failure.
 using FileRest = std::function<void()>;
-/// The first half, by any thread, on several files at once. Throws Failure.
+/// The first half, on any thread, for several files at once. Throws Failure.
 using FileStart = std::function<FileRest(const FoundFile& file)>;
-/// Takes what is wrong with a file, which standard error says too.
+/// Receives the problem of a file, which is also on standard error.
 using FileFailure = std::function<void(const std::string& path, const std::string& text)>;
 
-/// Works on all files, those below folders too. One for which that throws Failure goes to `fail`, unless it is passed
-/// over. False when a file failed, or the list of files. Says on standard error, unless quiet, when no folder held a
-/// file for the verb.
+/// Processes all files, including those in folders. A file for which that throws Failure is passed to `fail`, unless it
+/// is skipped. False if a file or the list of files failed. Unless quiet, reports on standard error that no folder held
+/// a file for the verb.
 bool forEachFile(const FileArguments& files, const FileLoop& loop, const FileStart& start, const FileFailure& fail);
-/// Files that are known ahead; `name` is that of the first argument.
+/// Files that are known in advance; `name` is that of the first argument.
 struct FoundFiles {
     std::string name;
     std::vector<FoundFile> files;
 };
 bool forEachFile(const FoundFiles& found, const FileLoop& loop, const FileStart& start, const FileFailure& fail);
 
-/// Gives the writer, by its `add`, what `read` says of each file; of one that failed the problem, by `addFailure`. Ends
-/// with the writer's `finish`. False when a file failed. `read` is called by any thread.
+/// Passes the result of `read` for each file to the writer's `add`, or its problem to `addFailure`. Ends with the
+/// writer's `finish`. False if a file failed. `read` is called on any thread.
 template <class Writer, class Files, class Read>
 bool writeFileByFile(Writer& writer, const Files& files, const FileLoop& loop, Read read)
 {

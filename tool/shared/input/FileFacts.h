@@ -1,4 +1,4 @@
-// What a file's name and folder tell of it, ahead of any look inside.
+// Facts from a file's name and folder, without opening it.
 #pragma once
 
 #include "platform/core/FourCC.h"
@@ -9,10 +9,10 @@
 #include <string>
 
 struct FileFacts {
-    FourCC typeByName = 0; // 0: the extension means none
+    FourCC typeByName = 0; // from the extension; 0 if it is unknown
     std::optional<StereoHalf> stereo;
     std::optional<platform::Date> modified;
 };
 
-/// Throws Failure for what is no regular file.
+/// Throws Failure if the path is no regular file.
 FileFacts factsOf(const std::string& path);

@@ -15,7 +15,7 @@ std::string absolutePath(const std::string& path)
         return path;
     if (path.empty())
         throw Failure(SystemErrorText(ENOENT));
-    char buffer[PATH_MAX]; // the system has no longer ones for it
+    char buffer[PATH_MAX]; // no path in system calls is longer
     if (::getcwd(buffer, sizeof buffer) == nullptr)
         throw Failure(SystemErrorText(errno));
     std::string folder = buffer;
@@ -28,7 +28,7 @@ std::string absolutePath(const std::string& path)
 
 platform::URLRef fileLocation(const std::string& name)
 {
-    // Not by way of CFileRef's paths, in which a "~" at the start means a home folder: the shell has read that already.
+    // Avoids CFileRef's paths, in which a leading "~" means a home folder: the shell has expanded that already.
     const std::string absolute = absolutePath(systemPath(name));
     platform::URLRef url = platform::URL::createWithFileSystemBytes(absolute, false);
     if (!url)

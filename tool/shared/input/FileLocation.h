@@ -1,4 +1,4 @@
-// The location of a file by its name on the command line, as the library takes it.
+// The library's location for a file name on the command line.
 #pragma once
 
 #include "platform/URL.h"

@@ -1,10 +1,10 @@
-// Whether a file is still the one that was looked at.
+// Detects whether a file has changed since it was examined.
 #pragma once
 
 #include <cstdint>
 #include <string>
 
-/// What changes with a file's content, or when another takes its place.
+/// Values that change with a file's content, or when another file replaces it.
 struct FileVersion {
     std::uint64_t device = 0, inode = 0;
     std::int64_t size = 0, modified = 0, changed = 0; // times in nanoseconds

@@ -104,7 +104,7 @@ bool FolderWalk::visitEntry(std::string path, const Entry& entry)
         return true;
     struct stat status = {}, link = {};
     if (::lstat(path.c_str(), &link) != 0 || ::stat(path.c_str(), &status) != 0)
-        return visit(std::move(path)); // whoever opens it will find out, and knows whether it matters
+        return visit(std::move(path)); // opening it will report the problem, if it matters
     if (S_ISDIR(status.st_mode))
         return (S_ISLNK(link.st_mode) && leadsInside(path)) || walk(path);
     return !S_ISREG(status.st_mode) || visit(std::move(path));

@@ -1,4 +1,4 @@
-// The files below folders, in a stable order.
+// Walks the files below folders in a stable order.
 #pragma once
 
 #include "tool/shared/input/FoundFile.h"
@@ -9,26 +9,26 @@
 #include <utility>
 #include <vector>
 
-/// Whether the path leads to a folder; standard input, "-", is none.
+/// Whether the path leads to a folder; false for "-", standard input.
 bool isFolder(const std::string& path);
 
-/// Visits each folder once, in the order of its names' bytes, and holds no more than the names of the folders that it
-/// is in. Names that begin with a dot are left out. Links to files are files; a link to a folder is followed when it
-/// leads out of the folders named, so that nothing is met twice and no circle is walked.
+/// Visits each folder once, in byte order of the names, and keeps only the names in the folders that it is in. Skips
+/// names that begin with a dot. Links to files count as files; a link to a folder is followed only if it leads out of
+/// the folders named, so that nothing is met twice and no circle is walked.
 class FolderWalk {
 public:
     /// False ends the walk.
     using Visit = std::function<bool(FoundFile file)>;
 
-    /// The roots may be files too, which are visited whatever they are.
+    /// The roots may be files, which are always visited.
     FolderWalk(std::vector<std::string> roots, Visit visit);
-    /// False when it was ended.
+    /// False if the walk was ended.
     bool run();
 
 private:
     struct Entry {
         std::string name;
-        unsigned char type; // DT_DIR and its like
+        unsigned char type; // DT_DIR and so on
     };
 
     bool walk(const std::string& folder);
@@ -41,6 +41,6 @@ private:
     std::vector<std::string> roots_;
     std::vector<std::string> resolvedRoots_;
     Visit visit_;
-    std::size_t rootLength_ = 0;                             // of the folder that is walked
-    std::set<std::pair<std::uint64_t, std::uint64_t>> seen_; // device and inode of folders
+    std::size_t rootLength_ = 0;                             // of the folder being walked
+    std::set<std::pair<std::uint64_t, std::uint64_t>> seen_; // device and inode of each folder
 };

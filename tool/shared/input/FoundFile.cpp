@@ -49,6 +49,6 @@ bool isPassedOver(const FoundFile& file, const Failure& failure)
     const auto* const other = dynamic_cast<const OtherKind*>(&failure);
     if (other != nullptr && other->isAudio())
         return true;
-    // A link that leads nowhere is of interest only when it should lead to sound.
+    // A dangling link matters only if its name is that of sound.
     return !isCalledAudio(file.path) && (other != nullptr || ::access(file.path.c_str(), F_OK) != 0);
 }

@@ -57,7 +57,7 @@ CFileRef referenceTo(const std::string& path)
 
 namespace {
 
-/// Whether the disk gives the ends of the file, where headers and tables are.
+/// Whether both ends of the file, where headers and tables are, can be read from the disk.
 bool canBeRead(CFileIO& file)
 {
     constexpr std::int64_t most = 1 << 22;
@@ -81,7 +81,7 @@ void openAudio(CAudioFileIO& file, const std::string& path)
 
 void requireKnown(const std::string& path)
 {
-    if (!isCalledContainer(path) && isCalledAudio(path)) // it mostly is
+    if (!isCalledContainer(path) && isCalledAudio(path)) // then it mostly is
         return;
     CFileIO file;
     requireOK(file.OpenRead(referenceTo(path), 0));
@@ -114,7 +114,7 @@ void openContainer(CAudioFileIO& file, const std::string& path, unsigned int mod
 {
     const ContainerProblem problem = OpenContainer(file, referenceTo(path), mode);
     if (problem.kind == ContainerProblem::Kind::noContainer)
-        requireKnown(path); // says best what is wrong with it
+        requireKnown(path); // knows best what is wrong with it
     requireNone(problem);
 }
 
@@ -125,7 +125,7 @@ void openChunks(CAudioFileIO& file, const std::string& path)
         return;
     try {
         openContainer(file, path, 0);
-    } catch (const Failure& failure) { // which says why
+    } catch (const Failure& failure) { // says why
         throw OtherKind(failure.what(), isCalledContainer(path) ? OtherKind::Kind::unknown : OtherKind::Kind::audio);
     }
 }

@@ -1,4 +1,4 @@
-// The samples of one audio file, of any format, in pieces.
+// Reads the samples of one audio file of any format, piece by piece.
 #pragma once
 
 #include "audiofile/CAudioFileIO.h"
@@ -11,17 +11,17 @@
 /// Owns the open file. Operations throw Failure.
 class SoundReader {
 public:
-    /// Opens it, and makes sure that there is sound in it that can be read.
+    /// Opens the file and requires readable sound.
     explicit SoundReader(const std::string& path);
 
     CAudioFileIO& file() { return file_; }
     const AudioFileInfo& info() const { return file_.Info(); }
-    /// What people should know of a file that ends ahead of its samples; else empty.
+    /// A note if the file ends before its samples do; else empty.
     std::string note() const;
 
-    /// Takes interleaved frames, full scale being 1, and how many they are.
+    /// Receives interleaved frames with full scale 1, and their number.
     using Visit = std::function<void(const float* samples, std::int64_t frames)>;
-    /// The frames from `from` up to `to`, which lies within the sound.
+    /// Reads the frames from `from` up to `to`, which lies within the sound.
     void read(std::int64_t from, std::int64_t to, const Visit& visit);
 
 private:
@@ -29,5 +29,5 @@ private:
     std::vector<float> piece_;
 };
 
-/// The rate of what has a place in time. Throws Failure for a file that claims one beyond reason.
+/// The sample rate, needed to place frames in time. Throws Failure if the file claims an absurd one.
 double sampleRateOf(const AudioFileInfo& info);

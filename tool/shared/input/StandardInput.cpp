@@ -16,7 +16,7 @@
 
 namespace {
 
-/// For the rest of the process, as readers open it by its path at any time.
+/// Kept until the process ends, because readers may open it by its path at any time.
 struct Input {
     std::string path;
     std::string problem;
@@ -28,7 +28,7 @@ std::string pathOf(int descriptor)
     return fmt::format("/proc/self/fd/{}", descriptor);
 }
 
-/// Whether it can be opened again: a file that another user opened for us may not be.
+/// Whether it can be opened again, which a file opened for us by another user may forbid.
 bool isFileFromItsStart()
 {
     struct stat status = {};
@@ -40,7 +40,7 @@ bool isFileFromItsStart()
     return again >= 0;
 }
 
-/// The text of what went wrong; empty when nothing did.
+/// The text of an error; empty if there is none.
 std::string copyInput(int to)
 {
     constexpr std::size_t pieceSize = 1 << 20;
@@ -80,7 +80,7 @@ Input takeInput()
     return {pathOf(memory), std::move(problem), true};
 }
 
-// What failed once is not tried again, on the rest of a pipe.
+// A failure is final: a second attempt would read the rest of a pipe.
 const Input& input()
 {
     static const Input taken = takeInput();

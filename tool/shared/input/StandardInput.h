@@ -1,4 +1,4 @@
-// Standard input where a file's name stands: "-". A file that is called so is "./-".
+// Standard input under the file name "-". A file with that name is "./-".
 #pragma once
 
 #include <cstdint>
@@ -9,9 +9,9 @@ inline constexpr const char* kStandardInput = "-";
 /// How much of a pipe is kept.
 inline constexpr std::int64_t kMostOfStandardInput = std::int64_t{2} << 30;
 
-/// Where the system has what `name` names: standard input if that is "-", else `name` itself. A file on standard input
-/// is taken where it lies, if nothing of it was read. Anything else is read to its end into memory, once. Throws
-/// Failure, also for more than kMostOfStandardInput.
+/// The system's path for `name`: standard input if it is "-", else `name` itself. A file on standard input is used
+/// directly if nothing was read from it yet. Anything else is read into memory once, to its end. Throws Failure, also
+/// beyond kMostOfStandardInput.
 std::string systemPath(const std::string& name);
 
 /// Whether `name` is standard input and no file.

@@ -18,7 +18,7 @@ bool isFile(const std::string& path)
     return ::stat(path.c_str(), &status) == 0 && S_ISREG(status.st_mode);
 }
 
-/// The ways to spell a short text in upper and lower case, as it is given first.
+/// All spellings of a short text in upper and lower case, the given one first.
 std::vector<std::string> spellings(const std::string& text)
 {
     std::vector<std::string> all{text};
@@ -62,7 +62,7 @@ std::string upperCase(std::string_view text)
     return upper;
 }
 
-/// What stands at the end of a name, ahead of the extension.
+/// The sides at the end of a name, before the extension.
 struct Sides {
     std::string_view left, right;
 };
@@ -70,7 +70,7 @@ constexpr Sides kSides[] = {{".l", ".r"},        {"_l", "_r"},         {"-l", "-
                             {"(l)", "(r)"},      {".left", ".right"},  {"_left", "_right"}, {"-left", "-right"},
                             {" left", " right"}, {"(left)", "(right)"}};
 
-/// The other side as it would be written beside `given`: "Left" and "Right", "LEFT" and "RIGHT".
+/// Spells the other side like `given`: "Left" and "Right", "LEFT" and "RIGHT".
 std::string inCaseOf(std::string_view given, std::string_view other)
 {
     const auto isLower = [](char c) { return c >= 'a' && c <= 'z'; };
@@ -85,7 +85,7 @@ std::string inCaseOf(std::string_view given, std::string_view other)
     return text;
 }
 
-/// The partner by the names that it may have, of which the first is the most likely.
+/// Finds the partner among its possible names, the most likely one first.
 StereoHalf withPartner(bool isLeft, const std::vector<std::string>& names)
 {
     const auto found = std::ranges::find_if(names, isFile);
@@ -93,7 +93,7 @@ StereoHalf withPartner(bool isLeft, const std::vector<std::string>& names)
     return {.isLeft = isLeft, .partner = exists ? *found : names.front(), .partnerExists = exists};
 }
 
-/// Programs write names in capitals, small, or in between; `suffix` is short.
+/// Programs write the suffixes, which are short, in any mixture of case.
 std::vector<std::string> namesByTable(const std::string& stem, const std::string& suffix)
 {
     std::vector<std::string> names = spellings(suffix);

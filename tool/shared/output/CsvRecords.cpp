@@ -40,7 +40,8 @@ std::string cellText(const platform::Value& value)
 
 void appendCellShown(std::string& row, const std::string& cell)
 {
-    static const bool onTerminal = isTerminal(STDOUT_FILENO); // which must not take part of a name for a command
+    // A terminal must not take part of a name for a command.
+    static const bool onTerminal = isTerminal(STDOUT_FILENO);
     appendCsvCell(row, onTerminal ? printable(cell) : cell);
 }
 

@@ -1,10 +1,10 @@
-// The records of a verb, as JSON or as CSV.
+// A verb's records, as JSON or as CSV.
 #pragma once
 
 #include "tool/shared/output/CsvRecords.h"
 #include "tool/shared/output/JsonRecords.h"
 
-/// Writes nothing unless either is asked for.
+/// Writes nothing unless one of them was requested.
 class DataRecords {
 public:
     DataRecords(const OutputOptions& options, CsvColumns columns)
@@ -24,7 +24,7 @@ public:
         json.endObject();
         json_.end();
     }
-    // For records that are more than members, or several rows:
+    // For records with more than members, or with several rows.
     JsonRecords& jsonRecords() { return json_; }
     CsvRecords& csvRecords() { return csv_; }
 
@@ -33,7 +33,7 @@ public:
         csv_.addFailure(path, text);
         json_.addFailure(path, text);
     }
-    /// Behind the last; there may have been none.
+    /// Call after the last record, even if there was none.
     void finish()
     {
         csv_.finish();

@@ -7,18 +7,18 @@ namespace {
 
 constexpr char32_t kReplacement = 0xFFFD;
 
-// As terminals have it, where the library says otherwise.
+// Follows terminals where the library differs from them.
 int widthOf(char32_t character)
 {
     const utf8proc_property_t& properties = *utf8proc_get_property(static_cast<utf8proc_int32_t>(character));
     if (properties.category == UTF8PROC_CATEGORY_MC)
-        return 1; // these marks have room of their own
+        return 1; // these marks are not combining on terminals
     if (properties.boundclass == UTF8PROC_BOUNDCLASS_V || properties.boundclass == UTF8PROC_BOUNDCLASS_T)
-        return 0; // the vowels and finals of Korean syllables that are taken apart
+        return 0; // vowels and finals of decomposed Korean syllables
     return utf8proc_charwidth(static_cast<utf8proc_int32_t>(character));
 }
 
-/// The longest beginning of `text` that fits, with all that combines with its last character.
+/// The longest prefix of `text` that fits, including everything that combines with its last character.
 std::string_view beginning(std::string_view text, int width)
 {
     std::string_view rest = text;
@@ -31,7 +31,7 @@ std::string_view beginning(std::string_view text, int width)
     return text.substr(0, size);
 }
 
-/// The longest end of `text` that fits and does not begin with what combines with the character before.
+/// The longest suffix of `text` that fits and does not begin with a combining character.
 std::string_view ending(std::string_view text, int width)
 {
     int tooMuch = displayWidth(text) - width;
@@ -108,7 +108,7 @@ std::string wrapped(std::string_view text, int width, int column, int indent)
     std::string result;
     for (bool isFirst = true; !text.empty(); isFirst = false) {
         const std::size_t end = std::min(text.find(' ', text.find_first_not_of(' ')), text.size());
-        std::string_view word = text.substr(0, end); // with the spaces ahead of it
+        std::string_view word = text.substr(0, end); // with the spaces before it
         text.remove_prefix(end);
         if (!isFirst && column + displayWidth(word) > width && word.find_first_not_of(' ') != word.npos) {
             word.remove_prefix(word.find_first_not_of(' '));

@@ -1,24 +1,24 @@
-// How wide text is on a terminal, and text made to fit: names cut in the middle, sentences broken between words.
+// The width of text on a terminal, and text made to fit: names cut in the middle, sentences broken between words.
 #pragma once
 
 #include <string>
 #include <string_view>
 
-/// The next character of UTF-8, by which `text` is shortened; U+FFFD for a byte that begins none, and for the beginning
-/// of one that is not whole (The Unicode Standard, table 3-7, and section 3.9 on maximal subparts).
+/// Takes the next character of UTF-8 off `text`. U+FFFD for a byte that begins no character, and for the start of an
+/// incomplete one (The Unicode Standard, table 3-7, and section 3.9 on maximal subparts).
 char32_t takeCharacter(std::string_view& text);
 
-/// Whether a terminal shows something for the character, or combines it with the one before: no control, no separator
-/// of lines, and known to Unicode.
+/// Whether a terminal shows the character or combines it with the one before: not for controls, line separators and
+/// characters unknown to Unicode.
 bool isShowable(char32_t character);
 
-/// Terminal columns that a text from `printable` takes: 2 for wide characters, 0 for combining ones.
+/// Terminal columns of a text from `printable`: 2 for wide characters, 0 for combining ones.
 int displayWidth(std::string_view text);
 
-/// The text in no more than `width` columns: what does not fit gives way to "…" in the middle, nearer to the beginning,
-/// since the end of a path says more. No character is parted from those that combine with it.
+/// The text in at most `width` columns: "…" replaces what does not fit, nearer to the beginning than to the end, since
+/// the end of a path says more. Characters stay together with those that combine with them.
 std::string shortened(std::string_view text, int width);
 
-/// The text in lines of no more than `width` columns, the first of which begins at `column` and the others are indented
-/// by `indent`; a word that is wider than a line is left whole. Without a line break at the end.
+/// The text in lines of at most `width` columns. The first begins at `column`, the others are indented by `indent`; a
+/// word wider than a line stays whole. Without a line break at the end.
 std::string wrapped(std::string_view text, int width, int column, int indent);

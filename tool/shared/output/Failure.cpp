@@ -18,7 +18,7 @@ void requireOK(std::int32_t status)
 void reportFailure(const std::string& path, const std::string& text)
 {
     const progressline::Cleared cleared;
-    // Not by fmt::print, which throws where standard error cannot be written: the work is not to end for that.
+    // Not fmt::print, which throws if standard error cannot be written; the work must go on.
     std::fputs(
         fmt::format("ktfiles: {}: {}\n", printableOnError(shownName(path)), printableOnError(shownName(text))).c_str(),
         stderr);

@@ -17,7 +17,7 @@ namespace {
 
 constexpr std::chrono::seconds kQuietBeginning{1};
 
-std::atomic<FilesProgress*> shown = nullptr; // the outermost
+std::atomic<FilesProgress*> shown = nullptr; // the outermost one
 thread_local double partsOfThread = 0;
 
 std::string timeText(double seconds)
@@ -41,7 +41,7 @@ FilesProgress::FilesProgress(std::string doing, bool quiet)
 {
     FilesProgress* none = nullptr;
     if (active_ && shown.compare_exchange_strong(none, this))
-        removeTemporaryFilesAtEndingSignals(); // and the line with them
+        removeTemporaryFilesAtEndingSignals(); // these signals clear the line too
 }
 
 FilesProgress::~FilesProgress()
@@ -81,7 +81,7 @@ void FilesProgress::advance(std::int64_t files, double parts)
 {
     done_ += files;
     parts_ -= parts;
-    if (total_ == 0 || done_ < total_) // else the work is done
+    if (total_ == 0 || done_ < total_) // otherwise the work is done
         draw();
 }
 

@@ -1,5 +1,4 @@
-// The progress of work on files, on standard error: what is done, how many of how many, the time left, and which file
-// is worked on.
+// Progress of work on files, on standard error: how many of how many are done, the time left, and the current file.
 #pragma once
 
 #include <atomic>
@@ -8,22 +7,22 @@
 #include <mutex>
 #include <string>
 
-/// Shows itself after a second, on a terminal only, and is gone when it is destroyed. Any thread may tell it anything.
+/// Appears after a second, on a terminal only, and disappears on destruction. May be updated by any thread.
 class FilesProgress {
 public:
-    /// `doing` says what is done: "scanning".
+    /// `doing` names the work: "scanning".
     FilesProgress(std::string doing, bool quiet);
     FilesProgress(const FilesProgress&) = delete;
     FilesProgress& operator=(const FilesProgress&) = delete;
     ~FilesProgress();
 
-    /// Whether it will ever show, and so whether counting the files ahead is of use.
+    /// Whether it will ever appear, so that counting the files in advance is useful.
     bool isActive() const { return active_; }
-    /// One file is told of by the part that is done of it, not by its number.
+    /// Progress within a single file is shown by the part done.
     void setTotal(std::int64_t files) { total_ = files; }
-    /// Ahead of the work on a file.
+    /// Call before the work on a file.
     void begin(const std::string& path);
-    /// What this thread added as parts since it last asked, which `advance` makes whole files of.
+    /// The parts added by this thread since the last call, which `advance` turns into whole files.
     static double takeParts();
     void advance(std::int64_t files, double parts = 0);
 
@@ -38,9 +37,9 @@ private:
 
     std::string doing_;
     bool active_;
-    std::atomic<std::int64_t> total_ = 0; // 0: not known yet
+    std::atomic<std::int64_t> total_ = 0; // 0 if not known yet
     std::atomic<std::int64_t> done_ = 0;
-    std::atomic<double> parts_ = 0; // of the files that are worked on
+    std::atomic<double> parts_ = 0; // of files in progress
     std::mutex nameMutex_;
     std::string name_;
     Clock::time_point start_ = Clock::now();

@@ -1,4 +1,4 @@
-// The JSON of a verb: one array with a record on each line, or with --jsonl a record on each line and nothing else.
+// A verb's JSON: one array with a record per line, or with --jsonl only the lines.
 #pragma once
 
 #include "tool/shared/output/Failure.h"
@@ -8,15 +8,15 @@ class JsonRecords {
 public:
     explicit JsonRecords(const OutputOptions& options);
 
-    /// For the next record, of which it takes one value.
+    /// Begins a record, which must be a single value.
     JsonWriter& begin();
-    /// Behind each record. A line is written through at once, so that who reads it can go on.
+    /// Call after each record. Lines are flushed, so that a reader can continue.
     void end();
-    // Nothing where no JSON is asked for:
+    // Do nothing if no JSON was requested.
 
-    /// A record of a file that failed.
+    /// Adds the record of a file that failed.
     void addFailure(const std::string& path, const std::string& text);
-    /// Behind the last; there may have been none.
+    /// Call after the last record, even if there was none.
     void finish();
 
 private:
@@ -27,7 +27,7 @@ private:
     JsonWriter json_{Output::standard()};
 };
 
-/// The record of a verb that works on one file: `write` gives the writer its one value.
+/// The record of a verb that processes one file: `write` writes its single value.
 template <class Write>
 void writeRecord(const OutputOptions& options, Write write)
 {
@@ -37,8 +37,8 @@ void writeRecord(const OutputOptions& options, Write write)
     records.finish();
 }
 
-/// reportingFailures of a verb that works on one file: in JSON a Failure is the one record. What `work` prints comes
-/// last in it.
+/// reportingFailures for a verb that processes one file: in JSON a Failure is the only record. `work` must not print
+/// before it can no longer fail.
 template <class Work>
 bool reportingRecord(const std::string& path, const OutputOptions& options, Work work)
 {

@@ -51,7 +51,7 @@ void Output::writeThrough(std::string_view bytes)
         const ssize_t written = ::write(STDOUT_FILENO, bytes.data(), bytes.size());
         if (written >= 0) {
             bytes.remove_prefix(static_cast<std::size_t>(written));
-        } else if (errno == EAGAIN) { // whoever shares the pipe with us made it non-blocking
+        } else if (errno == EAGAIN) { // a process that shares the pipe made it non-blocking
             pollfd ready{STDOUT_FILENO, POLLOUT, 0};
             ::poll(&ready, 1, -1);
         } else if (errno != EINTR) {

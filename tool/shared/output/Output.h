@@ -1,4 +1,4 @@
-// Standard output, buffered, with the failures that a stream forgets.
+// Standard output, buffered, without losing track of failures as streams do.
 #pragma once
 
 #include "tool/shared/output/Terminal.h"
@@ -9,26 +9,26 @@
 #include <string>
 #include <string_view>
 
-/// What is asked for with --json and --jsonl.
+/// The choice of --json and --jsonl.
 enum class JsonShape { none, array, lines };
 
-/// The options that every verb takes, and that of CSV.
+/// The options that every verb takes, and --csv.
 struct OutputOptions {
     JsonShape json = JsonShape::none;
-    bool csv = false; // of verbs that have it; never beside JSON
+    bool csv = false; // for verbs that have it; never together with JSON
     bool quiet = false;
     ColorMode color = ColorMode::automatic;
 
     bool wantsJson() const { return json != JsonShape::none; }
 };
 
-/// How results are written: for people, for scripts by line, as JSON or as CSV, or not at all.
+/// The form of results: for people, lines for scripts, JSON, CSV, or nothing.
 enum class Form { table, lines, json, csv, none };
 
-/// JSON or CSV where asked for; else nothing when quiet; else a table on a terminal and wherever colour is demanded.
+/// JSON or CSV if requested; else nothing if quiet; else a table on a terminal or if colour is forced; else lines.
 Form outputForm(const OutputOptions& options);
 
-/// The one writer to standard output. After a failed write (a full disk, a closed pipe) the rest is dropped.
+/// The only writer to standard output. After a failed write (full disk, closed pipe) the rest is dropped.
 class Output {
 public:
     static Output& standard();
@@ -41,14 +41,14 @@ public:
             flush();
     }
     void write(std::string_view bytes);
-    /// False when anything could not be written.
+    /// False if anything could not be written.
     bool flush();
     bool failed() const { return error_ != 0; }
-    /// Flushes; false when anything was lost, after one line on standard error unless the reader has gone away.
+    /// Flushes; false if anything was lost, after a line on standard error unless the reader is gone.
     bool finish();
 
 private:
-    friend class JsonWriter; // which formats in place
+    friend class JsonWriter; // formats directly into the buffer
     static constexpr std::size_t kFlushSize = 64 * 1024;
     void writeThrough(std::string_view bytes);
 

@@ -1,4 +1,4 @@
-// The progress of work on one file, by bytes or frames.
+// Progress of work on one file, in bytes or frames.
 #pragma once
 
 #include "tool/shared/output/FilesProgress.h"
@@ -8,10 +8,10 @@
 #include <optional>
 #include <string>
 
-/// A part of the work on many files where these have a line of progress, else a line of its own.
+/// A part of the progress on many files if that is shown, else a line of its own.
 class Progress {
 public:
-    /// `total` bytes of work; `doing` says what is done with the file. Both it and `path` are for a line of its own.
+    /// `total` is the number of bytes; `doing` names the work. It and `path` are used for a line of its own.
     Progress(std::string doing, std::int64_t total, bool quiet, const std::string& path = {});
     Progress(const Progress&) = delete;
     Progress& operator=(const Progress&) = delete;
@@ -25,5 +25,5 @@ private:
     std::int64_t done_ = 0;
 };
 
-/// The progress of each copy that the library tells of.
+/// The progress of each copy that the library reports.
 std::function<void(std::int64_t done, std::int64_t all)> copyProgress(std::string path, bool quiet);

@@ -12,14 +12,14 @@ namespace {
 using Clock = std::chrono::steady_clock;
 
 constexpr std::chrono::milliseconds kBetweenDraws{100};
-constexpr std::chrono::milliseconds kBehindOutput{300}; // output that comes in a stream is progress enough
+constexpr std::chrono::milliseconds kBehindOutput{300}; // streaming output is progress enough
 
-std::recursive_mutex mutex; // the thread that writes output may be told of progress meanwhile
+std::recursive_mutex mutex; // recursive: the thread that writes output may report progress meanwhile
 std::atomic<bool> isShown = false;
 std::atomic<Clock::time_point> nextDraw = Clock::time_point();
 static_assert(std::atomic<bool>::is_always_lock_free);
 
-// Past the buffer of the stream, which a signal handler must not touch. A terminal that takes nothing gets no progress.
+// Bypasses the stream's buffer, which a signal handler must not touch. A terminal that is not ready gets no progress.
 void put(std::string_view text)
 {
     [[maybe_unused]] const ssize_t written = ::write(STDERR_FILENO, text.data(), text.size());
@@ -37,7 +37,7 @@ void progressline::draw(const std::function<std::string(int columns)>& text)
     if (!lock)
         return;
     nextDraw = Clock::now() + kBetweenDraws;
-    const int columns = terminalColumns() - 1; // a full line would begin the next one
+    const int columns = terminalColumns() - 1; // a full line would wrap
     isShown = true;
     put("\r" + text(columns) + "\x1b[K");
 }

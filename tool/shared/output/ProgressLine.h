@@ -1,18 +1,18 @@
-// The one line on standard error that tells people who wait how far the work is.
+// The line of progress on standard error.
 #pragma once
 
 #include <functional>
 #include <mutex>
 #include <string>
 
-/// Drawn by any thread, and never mixed with other output: whatever writes to the terminal clears it first.
+/// Any thread may draw it. It never mixes with other output, because whatever writes to the terminal clears it first.
 namespace progressline {
 
-/// Draws, unless it did less than a tenth of a second ago, or other output was cleared for less than three. `text` is
-/// asked for the line only then, with the columns that it may take.
+/// Draws unless it did so less than a tenth of a second ago, or was cleared for other output less than three tenths
+/// ago. Calls `text` only then, with the columns available.
 void draw(const std::function<std::string(int columns)>& text);
 
-/// Clears the line if there is one; for as long as this lives none is drawn.
+/// Clears the line and prevents drawing during the lifetime of this object.
 class Cleared {
 public:
     Cleared();
@@ -21,7 +21,7 @@ private:
     std::lock_guard<std::recursive_mutex> lock_;
 };
 
-/// For a handler of signals that end the process.
+/// For handlers of signals that end the process.
 void clearFromSignalHandler();
 
 } // namespace progressline

@@ -1,4 +1,4 @@
-// What a verb tells of one file as data: values by their names, for JSON and CSV alike.
+// A verb's data about one file: named values, for both JSON and CSV.
 #pragma once
 
 #include "platform/core/Value.h"
@@ -21,7 +21,7 @@ public:
         fields_.push_back({std::move(name), std::move(value)});
         return *this;
     }
-    // What is not known has no name:
+    // Unknown values are omitted.
 
     template <class T>
     Record& knownMember(std::string name, const std::optional<T>& value)
@@ -33,7 +33,7 @@ public:
         return text.empty() ? *this : member(std::move(name), text);
     }
 
-    /// Into an object that has begun.
+    /// Writes into an object that has begun.
     void write(JsonWriter& json) const
     {
         for (const Field& field : fields_)

@@ -14,7 +14,7 @@ namespace {
 bool isUTF8(std::string_view text)
 {
     const bool isASCII = std::ranges::all_of(text, [](char c) { return static_cast<signed char>(c) >= 0; });
-    return isASCII || !platform::String::fromUTF8(text).isNull(); // most are the first, which is told without a copy
+    return isASCII || !platform::String::fromUTF8(text).isNull(); // most are ASCII, which needs no copy to check
 }
 
 bool isThere(const std::string& path)
@@ -28,7 +28,7 @@ void appendEscaped(std::string& text, char byte)
     fmt::format_to(std::back_inserter(text), "\\x{:02X}", static_cast<unsigned char>(byte));
 }
 
-/// The bytes of the character of UTF-8 that `text` begins with; 0: none.
+/// Length of the UTF-8 character that `text` begins with; 0 if there is none.
 std::size_t characterLength(std::string_view text)
 {
     for (std::size_t length = 1; length <= std::min<std::size_t>(text.size(), 4); ++length)
@@ -51,7 +51,7 @@ std::string escaped(std::string_view name)
     return text;
 }
 
-/// With every byte of its last component, which no other file is called then.
+/// Escapes every byte of the last component; no other file has such a name.
 std::string escapedThroughout(std::string_view name)
 {
     const std::size_t last = name.rfind('/') + 1;
@@ -61,7 +61,7 @@ std::string escapedThroughout(std::string_view name)
     return text;
 }
 
-/// None hides a slash or a NUL.
+/// Escapes must not hide a slash or a NUL.
 std::string withoutEscapes(std::string_view text)
 {
     std::string name;

@@ -9,8 +9,8 @@
 namespace {
 
 constexpr int kGap = 2;
-constexpr int kReadable = 20; // what is left of a name ahead of dropping a column for it
-constexpr int kLeast = 8;     // and when there is none to drop
+constexpr int kReadable = 20; // width of a name before columns are dropped for it
+constexpr int kLeast = 8;     // width if there is no column to drop
 constexpr int kLeftOut = -1;
 
 } // namespace
@@ -59,9 +59,9 @@ void Table::printRow(Output& output, const std::vector<std::string>& row, bool b
         const std::string padding(static_cast<std::size_t>(std::max(widths_[i] - displayWidth(cell), 0)), ' ');
         const bool isRight = columns_[i].align == Align::right;
         line += gap + (isRight ? padding + cell : cell);
-        gap = (isRight ? "" : padding) + std::string(kGap, ' '); // none behind the last
+        gap = (isRight ? "" : padding) + std::string(kGap, ' '); // no gap after the last column
     }
-    line.erase(line.find_last_not_of(' ') + 1); // as of a last cell that is empty
+    line.erase(line.find_last_not_of(' ') + 1); // left by empty last cells
     output.print("{}{}{}\n", bold ? "\x1b[1m" : "", line, bold ? "\x1b[0m" : "");
 }
 
@@ -88,7 +88,7 @@ int Table::totalWidth() const
     return total;
 }
 
-// Takes from the widest names first, and gives back what was taken for columns that are left out now.
+// Narrows the widest names first, and widens them again by the room of dropped columns.
 void Table::narrow(int least, int limit)
 {
     for (std::size_t i = 0; i < columns_.size(); ++i)

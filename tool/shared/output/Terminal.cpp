@@ -17,7 +17,7 @@ namespace {
 std::string printableText(std::string_view text, bool onTerminal)
 {
     if (std::all_of(text.begin(), text.end(), [](char c) { return c >= ' ' && c <= '~'; }))
-        return std::string(text); // most are
+        return std::string(text); // most texts are plain
     std::string result;
     while (!text.empty()) {
         const std::string_view before = text;

@@ -1,4 +1,4 @@
-// What the command must know of terminals: whether one is there, whether it takes colour, how wide text is on it.
+// Properties of the terminal: whether there is one, whether it has colour, how wide it is.
 #pragma once
 
 #include <optional>
@@ -9,14 +9,15 @@ enum class ColorMode { automatic, always, never };
 
 bool isTerminal(int descriptor);
 
-/// Whether what goes to standard output is coloured: asked for, or a terminal that does not decline (NO_COLOR, "dumb").
+/// Whether standard output is coloured: if requested, or on a terminal that does not decline (NO_COLOR, "dumb").
 bool usesColor(ColorMode mode);
 
-/// Columns of the terminal, as COLUMNS says, or else the terminal itself; 80 when neither does.
+/// Terminal columns according to COLUMNS, or else to the terminal itself; 80 if neither says.
 int terminalColumns();
 
-/// The same where standard output is a terminal. None where it is not: nothing has to fit there, so nothing is cut.
+/// As above if standard output is a terminal. None otherwise: then nothing needs to fit, so nothing is cut.
 std::optional<int> columnsOfOutput();
 
-/// `text` fit for one line: control characters, on a terminal unseen ones too, as `\xNN`; what is not UTF-8 as U+FFFD.
+/// `text` made fit for one line: control characters, and on a terminal invisible ones, as `\xNN`; invalid UTF-8 as
+/// U+FFFD.
 std::string printable(std::string_view text);

@@ -20,20 +20,20 @@ namespace {
 
 constexpr std::uint64_t kMost32 = std::numeric_limits<std::uint32_t>::max();
 
-/// None for a place that was cut off, or that no field can say.
+/// None for a position that was cut off or exceeds the field.
 std::optional<std::uint32_t> place32(const SoundChange& change, std::uint32_t frame)
 {
     const auto place = change.placeOf(frame);
     return place && *place <= kMost32 ? std::optional(static_cast<std::uint32_t>(*place)) : std::nullopt;
 }
 
-/// In blocks of a compressed sound the offset counts from the block on, and the position from the start.
+/// In compressed sound the offset counts from the block, and the position from the start.
 std::uint32_t frameOf(const CuePoint& point, bool isLinearPCM)
 {
     return !isLinearPCM && std::uint32_t{point.blockStart} != 0 ? point.position : point.sampleOffset;
 }
 
-/// All bytes set.
+/// All bits set.
 const CAFTimecode kNoTimecode = [] {
     CAFTimecode none;
     none.hours = none.minutes = none.seconds = none.frames = std::int8_t{-1};
@@ -59,7 +59,7 @@ Bytes CueMove::movedCues(BytesView body)
         const std::uint32_t position = point.position;
         point.position = position == frame ? *place : place32(change_, position).value_or(*place);
         point.sampleOffset = *place;
-        point.blockStart = 0; // of other samples
+        point.blockStart = 0; // refers to other samples
         kept.push_back(point);
     }
     cues->points = std::move(kept);
@@ -76,7 +76,7 @@ Bytes CueMove::movedLabels(BytesView body) const
     AssociatedDataList moved;
     if (order_ == std::endian::little) {
         moved = std::move(*list);
-    } else { // items are numbers of the other order
+    } else { // labels are numbers in the other byte order
         for (const CueText& label : list->labels())
             moved.addLabel(label.cueId, label.text);
         for (const CueText& note : list->notes())

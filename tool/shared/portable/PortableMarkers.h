@@ -1,4 +1,4 @@
-// Named places in the sound, as WAVE, AIFF and CAF have them, moved to where the sound has gone.
+// Named positions of WAVE, AIFF and CAF files, adapted to changed sound.
 #pragma once
 
 #include "platform/core/Bytes.h"
@@ -12,7 +12,7 @@
 /// The chunks "cue " and LIST "adtl" of one WAVE file, whose points are moved and dropped together.
 class CueMove {
 public:
-    /// Of RIFX the order is big. What is written is little-endian, and of linear PCM.
+    /// The order is big-endian for RIFX. The result is little-endian and for linear PCM.
     CueMove(const SoundChange& change, std::endian order, bool isLinearPCM)
         : change_(change),
           order_(order),
@@ -20,9 +20,9 @@ public:
     {
     }
 
-    /// Empty when no point is left.
+    /// Empty if no point is left.
     Bytes movedCues(BytesView body);
-    /// Behind movedCues. Empty when nothing is left.
+    /// Call after movedCues. Empty if nothing is left.
     Bytes movedLabels(BytesView body) const;
     std::size_t dropped() const { return dropped_.size(); }
 
@@ -32,7 +32,7 @@ private:
     SoundChange change_;
     std::endian order_;
     bool isLinearPCM_;
-    std::unordered_set<std::uint32_t> dropped_; // ids
+    std::unordered_set<std::uint32_t> dropped_; // ids of dropped points
 };
 
 struct PortableMarker {
@@ -41,23 +41,23 @@ struct PortableMarker {
     std::string name; // UTF-8
 };
 
-/// The markers of one file, for one of another kind.
+/// The markers of one file, for a file of another kind.
 struct PortableMarkers {
     std::vector<PortableMarker> markers;
-    bool hasMore = false; // than places and names: remarks, ranges
+    bool hasMore = false; // details beyond position and name: remarks, ranges
 
     void addFromWAVE(BytesView cues, const std::vector<BytesView>& lists, std::endian order, bool isLinearPCM);
     void addFromAIFF(BytesView marks);
-    /// `names` is the body of the "strg", or nothing.
+    /// `names` is the body of "strg", or empty.
     void addFromCAF(BytesView marks, BytesView names);
 
-    /// At their new places; returns how many were cut off.
+    /// Moves them to their new positions; returns how many were cut off.
     std::size_t move(const SoundChange& change);
-    /// None where there are none. `left` counts those that the type has no room for.
+    /// None if there are no markers. `left` counts those for which the type has no room.
     std::vector<HeldChunk> chunksFor(FourCC fileType, std::size_t& left) const;
 };
 
-/// The body of a "MARK" with its markers moved, and nothing else changed; `dropped` counts those that were cut off.
+/// The body of a "MARK" with its markers moved and nothing else changed; `dropped` counts those that were cut off.
 Bytes movedMarks(BytesView body, const SoundChange& change, std::size_t& dropped);
-/// The same of a CAF "mark".
+/// As above for a CAF "mark".
 Bytes movedCAFMarkers(BytesView body, const SoundChange& change, std::size_t& dropped);

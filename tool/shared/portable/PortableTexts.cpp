@@ -18,7 +18,7 @@ namespace {
 struct TextRow {
     const char* key;
     FourCC info; // in LIST "INFO"
-    FourCC aiff; // 0: no chunk has it
+    FourCC aiff; // 0: no chunk
 };
 constexpr std::array kRows{TextRow{"title", fourCC("INAM"), fourCC("NAME")},
                            TextRow{"artist", fourCC("IART"), fourCC("AUTH")},
@@ -61,7 +61,7 @@ void PortableTexts::add(std::string_view key, std::string text)
     const auto found = std::ranges::find(texts, key, [](const auto& each) { return std::string_view(each.first); });
     if (found == texts.end())
         texts.emplace_back(key, std::move(text));
-    else if (key == "comments") // of which AIFF may have several
+    else if (key == "comments") // AIFF may have several
         found->second += "\n" + text;
 }
 

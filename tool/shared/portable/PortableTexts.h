@@ -1,4 +1,4 @@
-// What a file says of itself in texts that WAVE, AIFF and CAF have a place for: title, artist, copyright and others.
+// Texts about a file that WAVE, AIFF and CAF all have a place for: title, artist, copyright and others.
 #pragma once
 
 #include "platform/core/Bytes.h"
@@ -9,32 +9,32 @@
 #include <utility>
 #include <vector>
 
-/// A chunk and what is in it.
+/// A chunk and its content.
 struct HeldChunk {
     FourCC id = 0;
     Bytes body;
 };
 
-/// The texts of one file, in UTF-8, each once by its key; keys are those of CAF's "info" ("title", "recorded date").
+/// The texts of one file in UTF-8, once per key; keys are those of CAF's "info" ("title", "recorded date").
 struct PortableTexts {
     std::vector<std::pair<std::string, std::string>> texts;
-    /// What was there and has no key, as it is called in its file ("ISFT", "tempo").
+    /// Names, in their file, of texts without a key ("ISFT", "tempo").
     std::vector<std::string> others;
 
-    /// From a LIST "INFO"; of RIFX the order is big.
+    /// From a LIST "INFO"; the order is big-endian for RIFX.
     void addFromWAVE(BytesView list, std::endian order);
-    /// From NAME, AUTH, "(c) " or ANNO; other chunks say nothing.
+    /// From NAME, AUTH, "(c) " or ANNO; ignores other chunks.
     void addFromAIFF(FourCC id, BytesView body);
-    /// A "COMT": the remarks that belong to no marker. Whether there are others.
+    /// From a "COMT": the remarks that belong to no marker. Returns whether there are others.
     bool addComments(BytesView comments);
     void addFromCAF(BytesView info);
 
-    /// The chunks that hold them in a file of the type (WAVE, AIFF or CAF), and the keys that it has no place for.
+    /// The chunks for these texts in a file of the type (WAVE, AIFF or CAF), and the keys for which it has no place.
     std::vector<HeldChunk> chunksFor(FourCC fileType, std::vector<std::string>& left) const;
 
 private:
     void add(std::string_view key, std::string text);
 };
 
-/// Whether CAF's "info" has the key for what is true of one file only, such as its bit rate.
+/// Whether the key of CAF's "info" describes one coding of the sound only, such as its bit rate.
 bool isOfOneCoding(std::string_view infoKey);

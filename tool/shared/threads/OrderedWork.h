@@ -1,5 +1,5 @@
-// Work done by several threads whose results come out in the order in which it was put in. Neither waiting work nor
-// waiting results pile up: whoever is ahead waits.
+// Work done by several threads with results in the order of the jobs. Neither jobs nor results pile up: whoever is
+// ahead waits.
 #pragma once
 
 #include "tool/shared/threads/StartedThread.h"
@@ -15,9 +15,9 @@
 #include <span>
 #include <vector>
 
-/// One thread gives jobs, one takes results. `work` runs on all threads at once and must not throw. Of the threads as
-/// many work as can be started; without any, the one that takes results works. The destructor stops the threads after
-/// the job that each is at.
+/// One thread gives jobs, one takes results. `work` runs on all threads at once and must not throw. As many threads are
+/// used as can be started; without any, the thread that takes results does the work. The destructor stops the threads
+/// after their current jobs.
 template <class Job, class Result>
 class OrderedWork {
 public:
@@ -35,7 +35,7 @@ public:
     }
     ~OrderedWork() { stop(); }
 
-    /// Waits for room, of half the window once it is full; false when no more is wanted.
+    /// Waits for room, once the window is full until half of it is free; false if no more is wanted.
     bool give(Job job)
     {
         std::unique_lock lock(mutex_);
@@ -46,7 +46,7 @@ public:
         (threads_.empty() ? done_ : ready_).notify_one();
         return true;
     }
-    /// No job will follow.
+    /// Announces that no job will follow.
     void close()
     {
         const std::lock_guard lock(mutex_);
@@ -54,7 +54,7 @@ public:
         ready_.notify_all();
         done_.notify_all();
     }
-    /// Waits for the next result; none when all were taken.
+    /// Waits for the next result; none if all were taken.
     std::optional<Result> take()
     {
         std::unique_lock lock(mutex_);
@@ -65,7 +65,7 @@ public:
             return std::nullopt;
         if (threads_.empty()) {
             ++started_;
-            Entry& entry = entries_.front(); // stays where it is while others come behind it
+            Entry& entry = entries_.front(); // its address is stable while others are added
             lock.unlock();
             Result result = work_(entry.job);
             lock.lock();
@@ -74,11 +74,12 @@ public:
         std::optional<Result> result = std::move(*entries_.front().result);
         entries_.pop_front();
         --started_;
-        if (entries_.size() == window_ / 2) // half of it at once: a wait for each job costs more than small jobs do
+        // Wakes the giver for half the window at once, because a wait for each small job costs more than the job.
+        if (entries_.size() == window_ / 2)
             room_.notify_one();
         return result;
     }
-    /// Ends all waiting of those that give jobs and of the workers.
+    /// Wakes everybody who gives jobs or works on them, for good.
     void stop()
     {
         const std::lock_guard lock(mutex_);
@@ -100,16 +101,16 @@ private:
             ready_.wait(lock, [this] { return stopped_ || closed_ || started_ < entries_.size(); });
             if (stopped_ || started_ == entries_.size())
                 return;
-            // Of many jobs several, for which one waits once; of few one, so that all threads have some.
+            // Takes several of many jobs at once to wait less often, and one of few, so that all threads have some.
             const std::size_t share = (entries_.size() - started_) / (2 * threadCount_);
-            std::array<Entry*, kMostAtOnce> taken; // they stay where they are while others come and go at the ends
+            std::array<Entry*, kMostAtOnce> taken; // addresses are stable while others come and go at the ends
             const std::size_t count = std::clamp<std::size_t>(share, 1, kMostAtOnce);
             for (std::size_t i = 0; i < count; ++i)
                 taken[i] = &entries_[started_++];
             workOn(std::span(taken).first(count), lock);
         }
     }
-    /// Results of quick jobs are handed over together, and none is kept for long.
+    /// Passes on results of quick jobs together, and keeps none for long.
     void workOn(std::span<Entry* const> taken, std::unique_lock<std::mutex>& lock)
     {
         std::array<std::optional<Result>, kMostAtOnce> results;
@@ -133,7 +134,7 @@ private:
 
     std::mutex mutex_;
     std::condition_variable room_, ready_, done_;
-    std::deque<Entry> entries_; // in order; the first `started_` are done or being worked on
+    std::deque<Entry> entries_; // in order; the first `started_` are done or in progress
     std::size_t started_ = 0;
     std::size_t threadCount_;
     std::size_t window_;

@@ -1,4 +1,4 @@
-// Threads that a verb is quicker with, and does without where the system has no room for another (`ulimit -u`, `-v`).
+// Threads that make a verb faster, and that it can do without if the system has no room for more (`ulimit -u`, `-v`).
 #pragma once
 
 #include "platform/SignalHold.h"
@@ -7,8 +7,8 @@
 #include <thread>
 #include <utility>
 
-/// A thread that runs `work`, which may take a stop token; not joinable when none could be started. Signals that end
-/// the process are left to the thread that started it, which knows when they may come.
+/// A thread that runs `work`, which may take a stop token; not joinable if none could be started. Signals that end the
+/// process go to the starting thread, which knows when they may arrive.
 template <class Work>
 std::jthread startedThread(Work&& work)
 try {

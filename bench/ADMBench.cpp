@@ -1,5 +1,5 @@
-// ADM documents: parsing against bare libxml2, which is pushed the same bytes and calls functions that do nothing;
-// looking IDs up; and the command.
+// ADM documents: parsing, compared with bare libxml2 that gets the same bytes and calls empty functions; looking IDs
+// up; and the command.
 #include "ADMDocuments.h"
 #include "Timing.h"
 #include "adm/ADMDocument.h"
@@ -41,7 +41,7 @@ private:
     std::FILE* file_;
 };
 
-/// A document in a temporary file, which is removed when the process ends.
+/// A document in a temporary file that is removed at the end of the process.
 class DocumentFile {
 public:
     explicit DocumentFile(ADMDocumentShape shape)
@@ -99,7 +99,7 @@ bool parseBare(const std::string& path)
     return isWellFormed;
 }
 
-/// A number of /proc/self/status in MiB.
+/// A value of /proc/self/status in MiB.
 double statusMiB(const std::string& key)
 {
     std::ifstream status("/proc/self/status");
@@ -109,14 +109,14 @@ double statusMiB(const std::string& key)
     return 0;
 }
 
-/// The peak counts from here on.
+/// Starts a new measurement of the peak.
 void resetPeak()
 {
     std::ofstream("/proc/self/clear_refs") << 5;
 }
 
-/// Both take turns, so that page cache and processor treat them alike, and the best turn of each counts: others work on
-/// the machine. The time of the benchmark is that of our own, taking the document down again included.
+/// Both alternate, so that page cache and processor treat them alike, and the best turn of each counts, because others
+/// use the machine. The benchmark's time is ours, including the destruction of the document.
 void parseDocuments(benchmark::State& state, ADMDocumentShape shape, int times)
 {
     const DocumentFile file(shape);
@@ -160,15 +160,15 @@ void ParseSmallADM(benchmark::State& state)
 }
 BENCHMARK(ParseSmallADM)->UseManualTime()->Unit(benchmark::kMillisecond)->Iterations(10);
 
-/// Nanoseconds that one read takes whose place the read before it told, in as much memory as the table of a million
-/// elements has: what a lookup cannot be spared that is alone.
+/// Nanoseconds for a read at a place that the previous read returned, in as much memory as a table of a million
+/// elements takes: the minimum for an isolated lookup.
 double dependentRead(std::size_t reads)
 {
     constexpr std::size_t slot = 32 / sizeof(std::uint32_t), slots = std::size_t{1} << 21;
     std::vector<std::uint32_t> places(slots), memory(slots * slot);
     std::iota(places.begin(), places.end(), 0U);
     std::shuffle(places.begin(), places.end(), std::mt19937(2));
-    for (std::size_t i = 0; i < slots; ++i) // one circle through all slots
+    for (std::size_t i = 0; i < slots; ++i) // one cycle through all slots
         memory[places[i] * slot] = places[(i + 1) % slots];
     std::uint32_t at = 0;
     const double start = cpuSeconds();
@@ -179,7 +179,7 @@ double dependentRead(std::size_t reads)
     return 1e9 * seconds / static_cast<double>(reads);
 }
 
-/// A million track UIDs, looked up in an order of chance; and the same as references of one object, which the document
+/// A million track UIDs looked up in random order; and the same as references of one object, which the document
 /// resolves. Medians of turns.
 void FindADMElement(benchmark::State& state)
 {
@@ -222,7 +222,7 @@ void FindADMElement(benchmark::State& state)
 }
 BENCHMARK(FindADMElement)->UseManualTime()->Unit(benchmark::kNanosecond)->Iterations(10);
 
-/// Of the processes that were waited for.
+/// Processor time of the processes that were waited for.
 double childrenSeconds()
 {
     rusage usage{};
@@ -233,7 +233,7 @@ double childrenSeconds()
     return seconds(usage.ru_utime) + seconds(usage.ru_stime);
 }
 
-/// `ktfiles adm --json` as a process, beside the library's parse of the same file.
+/// `ktfiles adm --json` as a process, compared with the library's parse of the same file.
 void ADMCommandJson(benchmark::State& state)
 {
     const DocumentFile file(kLarge);

@@ -5,9 +5,9 @@
 
 namespace {
 
-// Channel formats and objects are numbered from here: what lies below is for common definitions.
+// Channel formats and objects are numbered from here; lower numbers are for common definitions.
 constexpr int kFirstNumber = 0x1001;
-// Blocks in a second, and what one of them lasts.
+// Blocks per second, and the length of one.
 constexpr int kBlocksPerSecond = 50;
 constexpr int kBlockLength = 100000 / kBlocksPerSecond; // 1/100000 s
 

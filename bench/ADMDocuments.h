@@ -1,4 +1,4 @@
-// Documents for the benchmarks: as large as asked for, the same every time.
+// Documents for the benchmarks, of any size and the same every time.
 #pragma once
 
 #include "platform/InputStream.h"
@@ -10,8 +10,8 @@ struct ADMDocumentShape {
     int blocksPerObject = 1;
 };
 
-/// A document that is written while it is read, so that it never lies in memory: a programme, a content, and objects
-/// with moving positions, each with its pack, channel, stream and track format and its track UID.
+/// A document that is written while it is read, so that it is never in memory as a whole: a programme, a content, and
+/// objects with moving positions, each with its pack, channel, stream and track format and its track UID.
 class ADMDocumentStream : public platform::InputStream {
 public:
     explicit ADMDocumentStream(ADMDocumentShape shape);
@@ -25,9 +25,9 @@ private:
     void writeTail();
 
     ADMDocumentShape shape_;
-    std::string text_; // written, not read yet
+    std::string text_; // written but not read yet
     std::size_t at_ = 0;
-    int object_ = -1; // -1: the head comes next
+    int object_ = -1; // -1: the head is next
     int block_ = 0;
     bool isComplete_ = false;
 };

@@ -1,4 +1,4 @@
-// Coordinated access and locks, beside the bare system calls that do a part of it. Ratios are of one run; see
+// Coordinated access and locks, compared with the bare system calls for a part of the work. Ratios are of one run; see
 // bench/README.md.
 #include "CoordinationPlace.h"
 #include "Timing.h"
@@ -35,7 +35,7 @@ double seconds(int times, const std::function<void()>& work)
     return std::chrono::duration<double>(Clock::now() - start).count();
 }
 
-/// Both by turns, in bursts of 100, so that what disturbs the machine disturbs both alike: the median burst of each.
+/// Both alternate in bursts of 100, so that disturbances affect both alike. The median burst of each.
 void compare(benchmark::State& state, const std::function<void()>& reference, const std::function<void()>& ours)
 {
     constexpr int kBurst = 100;
@@ -85,7 +85,7 @@ void CoordinatedWriteFromPath(benchmark::State& state)
 }
 BENCHMARK(CoordinatedWriteFromPath)->UseManualTime()->MinTime(0.5);
 
-/// A thread that waits for work on a condition: the least that a handler on another thread can cost.
+/// A thread that waits for work on a condition variable: the minimum cost of a handler on another thread.
 class ParkedThread {
 public:
     ~ParkedThread()
@@ -117,11 +117,11 @@ private:
     std::mutex mutex_;
     std::condition_variable changed_;
     std::function<void()> work_;
-    bool isOver_ = false; // of the thread
+    bool isOver_ = false; // the thread has ended
     std::thread thread_{[this] { serve(); }};
 };
 
-/// At most 1.5 × a hand-off to a parked thread and back, and open, flock, close on the thread that began.
+/// At most 1.5 × a hand-off to a parked thread and back plus open, flock and close on the first thread.
 void PresenterRetainAndRelease(benchmark::State& state)
 {
     const Place place;
@@ -143,7 +143,7 @@ void PresenterRetainAndRelease(benchmark::State& state)
 }
 BENCHMARK(PresenterRetainAndRelease)->UseManualTime()->MinTime(0.5);
 
-/// With 100 idle presenter locks registered: at most 1.2 × with none.
+/// With 100 idle presenter locks registered: at most 1.2 × the time with none.
 void WriteBesideIdleLocks(benchmark::State& state)
 {
     const Place place;

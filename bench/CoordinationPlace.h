@@ -1,4 +1,4 @@
-// What the benchmarks of coordination share: a file that is coordinated in a folder of its own, and how it is written.
+// Shared by the coordination benchmarks: a file that is coordinated in a folder of its own, and a way to write it.
 #pragma once
 
 #include "coordination/KTFileCoordinationLock.h"
@@ -17,7 +17,7 @@ namespace coordinationbench {
 using namespace platform;
 using Clock = std::chrono::steady_clock;
 
-/// A file, and a coordination folder of the benchmark's own. Removed at the end.
+/// A file and its own coordination folder, removed at the end.
 class Place {
 public:
     Place()
@@ -56,7 +56,7 @@ inline void read(const CoordinatedItem& item)
     FileCoordinator().coordinateReading(item, FileCoordinator::ReadingOptions::none, [](const URLRef&) {});
 }
 
-/// What one thread tells another once.
+/// A signal from one thread to another, once.
 class Signal {
 public:
     void raise()

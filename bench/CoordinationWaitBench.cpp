@@ -1,5 +1,5 @@
-// Coordinated access that somebody else has: hand-offs between processes, and many processes that want one item. Ratios
-// are of one run; see bench/README.md.
+// Coordinated access that somebody else holds: hand-offs between processes, and many processes that compete for one
+// item. Ratios are of one run; see bench/README.md.
 #include "CoordinationPlace.h"
 
 #include <benchmark/benchmark.h>
@@ -38,7 +38,7 @@ std::int64_t now()
     return Clock::now().time_since_epoch().count();
 }
 
-/// The child: for each round waits for the item and notes when it came in.
+/// The child: in each round waits for the item and records when it got it.
 [[noreturn]] void comeIn(Way way, const Place& place, Relay& relay)
 {
     const CoordinatedItem item(place.url());
@@ -57,7 +57,7 @@ std::int64_t now()
     }
 }
 
-/// Returns when the process sleeps, and so waits for the item: for a while, as it may sleep on its way there.
+/// Returns once the process has slept for a while, so that it must be waiting for the item.
 void awaitSleep(pid_t process)
 {
     for (int seen = 0; seen < 4;) {
@@ -129,7 +129,7 @@ void HandOff(benchmark::State& state)
 }
 BENCHMARK(HandOff)->ArgName("way")->Arg(1)->Arg(2)->Iterations(1)->Unit(benchmark::kSecond);
 
-// Eight processes that all want the item.
+// Eight processes compete for the item.
 
 struct Share {
     std::atomic<std::int64_t> times = 0, longestWait = 0;
@@ -201,7 +201,7 @@ void EightProcesses(benchmark::State& state)
 }
 BENCHMARK(EightProcesses)->Iterations(1)->Unit(benchmark::kSecond);
 
-// One who leaves comes again at once, behind all who wait.
+// Whoever leaves comes back at once, behind all waiters.
 
 struct Crowd {
     std::atomic<int> ready = 0;
@@ -209,7 +209,7 @@ struct Crowd {
     std::atomic<std::int64_t> times = 0;
 };
 
-/// The microseconds from one access to the next while so many processes wait.
+/// Microseconds from one access to the next with that many processes waiting.
 double timePerHandOff(int waiting)
 {
     constexpr std::chrono::milliseconds kSettling(300), kLength(1000);
@@ -241,7 +241,7 @@ double timePerHandOff(int waiting)
     return taken;
 }
 
-/// How the time grows with the number of those who wait: the exponent of the power of it that fits best.
+/// Growth of the time with the number of waiters: the exponent of the best-fitting power.
 void Waiters(benchmark::State& state)
 {
     constexpr std::array<int, 4> kNumbers = {1, 10, 100, 1000};

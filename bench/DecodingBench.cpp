@@ -1,5 +1,5 @@
-// An hour of compressed sound decoded from end to end beside the ffmpeg command, places in it found, and what a process
-// pays for the library that never meets any.
+// An hour of compressed sound decoded from end to end, compared with the ffmpeg command; seeks in it; and what a
+// process pays for the library without ever decoding.
 #include "Timing.h"
 #include "audiofile/XStream.h"
 
@@ -23,7 +23,7 @@ namespace {
 
 constexpr std::uint32_t kBlock = 4096;
 
-/// Twelve times the same five minutes, made once and removed when the process ends.
+/// Twelve copies of the same five minutes, made once and removed at the end of the process.
 class Hours {
 public:
     static const Hours& shared()
@@ -65,7 +65,7 @@ XStreamRef openFloats(const std::string& path)
     return XStreamOpen(path.c_str(), 0, 0, 0, &client, nullptr, &stream) == 0 ? stream : nullptr;
 }
 
-/// Frames decoded, of the whole file.
+/// Number of frames decoded from the whole file.
 std::int64_t decode(const std::string& path)
 {
     std::vector<float> block(kBlock * 2);
@@ -84,7 +84,7 @@ void BM_DecodeHour(benchmark::State& state)
     const std::string path = Hours::shared().path(static_cast<int>(state.range(0)));
     const std::string command = "ffmpeg -nostdin -v quiet -threads 1 -i '" + path + "' -f null -";
     double ours = 0, theirs = 0;
-    decode(path); // what is loaded once is loaded
+    decode(path); // modules are loaded before measuring
     for (auto _ : state) {
         theirs += seconds([&] {
             if (std::system(command.c_str()) != 0)
@@ -137,7 +137,7 @@ BENCHMARK(BM_SeekInHour)
     ->Iterations(500)
     ->Unit(benchmark::kMillisecond);
 
-/// Half an hour of stereo noise as 16-bit WAVE at 44.1 kHz; made once and removed when the process ends.
+/// Half an hour of stereo noise as 16-bit WAVE at 44.1 kHz, made once and removed at the end of the process.
 class HalfHour {
 public:
     static const HalfHour& shared()
@@ -145,7 +145,7 @@ public:
         static const HalfHour file;
         return file;
     }
-    /// The command's words with "%" for the folder.
+    /// Runs the command, with the folder in place of "%".
     int run(std::string command) const
     {
         for (std::size_t at; (at = command.find('%')) != std::string::npos;)
@@ -220,7 +220,7 @@ void run(const char* program)
         std::abort();
 }
 
-/// Two processes in turns: one reads linear PCM through the library, the other reads the bytes and links libxml2 alone.
+/// Two processes in turns: one reads linear PCM through the library, the other reads the bytes and only links libxml2.
 void BM_StartUp(benchmark::State& state)
 {
     std::vector<double> differences;

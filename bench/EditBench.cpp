@@ -1,5 +1,5 @@
-// Edits in place of a file of 1 GiB, whose cost must not depend on the samples, and safe edits, whose cost must not
-// depend on what else is in the folder.
+// In-place edits of a file of 1 GiB, whose cost must not depend on the samples, and safe edits, whose cost must not
+// depend on other files in the folder.
 #include "Timing.h"
 #include "audiofile/CAudioFileIO.h"
 #include "audiofile/CContainerEdit.h"
@@ -31,7 +31,7 @@ constexpr FourCC kNote = fourCC("note");
 constexpr std::array<std::byte, 1024> kBody{};
 constexpr std::size_t kStart = 12 + 24 + 8 + 1024 + 8;
 
-/// A WAVE file with a chunk of 1 KiB ahead of its samples, which are a hole of `dataSize` bytes. Removed at the end.
+/// A WAVE file with a chunk of 1 KiB before its samples, which are a hole of `dataSize` bytes. Removed at the end.
 class LargeFile {
 public:
     explicit LargeFile(std::int64_t dataSize = kDataSize) : length_(static_cast<std::int64_t>(kStart) + dataSize)
@@ -63,7 +63,7 @@ public:
     LargeFile(const LargeFile&) = delete;
     LargeFile& operator=(const LargeFile&) = delete;
 
-    /// As it was made, as far as the edits below change it.
+    /// Restores the file, as far as the edits below change it.
     void restore() const
     {
         ByteWriter size(std::endian::little);
@@ -83,9 +83,9 @@ private:
     std::filesystem::path path_;
 };
 
-/// 1 KiB put behind the samples of files that were just opened and last changed a while ago, beside the calls that
-/// cannot be left out (is it still the file that was opened, the chunk, the container's size), and beside a single
-/// write; in turns, each on a file of its own.
+/// Adds 1 KiB after the samples of files that were just opened and last changed a while ago, compared with the
+/// indispensable calls (is it still the file that was opened, the chunk, the container's size) and with a single write;
+/// in turns, each on its own file.
 void AddBehindSamples(benchmark::State& state)
 {
     constexpr std::size_t count = 150;
@@ -135,7 +135,7 @@ void AddBehindSamples(benchmark::State& state)
 }
 BENCHMARK(AddBehindSamples)->UseManualTime()->Unit(benchmark::kMicrosecond)->Iterations(500);
 
-/// A chunk ahead of the samples, of which there are as many bytes as the argument says: the time must be the same.
+/// A chunk before the samples, whose size is the argument: the time must not depend on it.
 void RemoveAheadOfSamples(benchmark::State& state)
 {
     LargeFile file(state.range(0));
@@ -155,7 +155,7 @@ BENCHMARK(RemoveAheadOfSamples)
     ->Unit(benchmark::kMicrosecond)
     ->MinTime(0.5);
 
-/// A folder with a loop of 64 KiB, among as many others as are asked for. Removed at the end.
+/// A folder with a loop of 64 KiB among the given number of other files. Removed at the end.
 class LoopFolder {
 public:
     explicit LoopFolder(int others)
@@ -166,11 +166,11 @@ public:
         const LargeFile loop(1 << 16);
         std::filesystem::copy_file(loop.path(), loop_);
         std::ofstream(folder_ / "another loop.wav") << "RIFF";
-        for (int i = 0; i < others; ++i) // further names make the folder as large, and are made in no time
+        for (int i = 0; i < others; ++i) // links enlarge the folder quickly
             std::filesystem::create_hard_link(folder_ / "another loop.wav",
                                               folder_ / ("another loop " + std::to_string(i) + ".wav"));
         if (const int folder = open(folder_.c_str(), O_RDONLY | O_CLOEXEC); folder >= 0) {
-            syncfs(folder); // a folder as it lies there, not one whose making is still to be written down
+            syncfs(folder); // the folder's creation must be on the disk already
             close(folder);
         }
     }
@@ -188,7 +188,7 @@ public:
         });
     }
 
-    /// The calls that such an edit cannot do without: the new content under a name of its own, committed, and renamed.
+    /// The indispensable calls of such an edit: write the new content under a temporary name, commit it, rename it.
     bool replaceBare() const
     {
         const int folder = open(folder_.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC);
@@ -208,8 +208,8 @@ private:
     std::filesystem::path folder_, loop_;
 };
 
-/// An edit on a copy, with its syncs, in a folder with 40,000 files more, beside the same in an empty one, and beside
-/// the bare calls in both; in turns.
+/// An edit on a copy, with its syncs, in a folder with 40,000 more files, compared with an empty folder and with the
+/// bare calls in both; in turns.
 void SafeEditInFolder(benchmark::State& state)
 {
     const LoopFolder folders[] = {LoopFolder(0), LoopFolder(40'000)};

@@ -1,4 +1,4 @@
-// Bytes of files: what CFileIO costs above the system calls that it makes.
+// Reading and writing files: the overhead of CFileIO above its system calls.
 #include "files/CFileIO.h"
 #include "platform/core/CRC32.h"
 
@@ -16,9 +16,9 @@ namespace {
 
 constexpr long kMiB = 1048576;
 constexpr long long kMovedSize = 1024LL * kMiB;
-constexpr long long kDistance = 4096; // a chunk's worth, as when a tag is put ahead of the samples
+constexpr long long kDistance = 4096; // the size of a chunk, as when a tag is inserted before the samples
 
-/// A file of its own below the temporary folder, filled piece by piece, removed at the end.
+/// A file in the temporary folder, filled piece by piece, removed at the end.
 class ScratchFile {
 public:
     explicit ScratchFile(long long size) : path_(std::filesystem::temp_directory_path() / "ktfiles-bench-XXXXXX")
@@ -42,8 +42,8 @@ private:
     std::string path_;
 };
 
-/// Up and down again, so that the file is as before. Both roads alternate on one file: page cache and disk treat them
-/// alike.
+/// Moves up and down again, so that the file is unchanged. Both ways alternate on one file, so that page cache and disk
+/// treat them alike.
 void moveBySystemCalls(int descriptor, long long from, long long to, std::vector<char>& buffer)
 {
     const long long distance = to - from;
@@ -110,7 +110,7 @@ void BM_CRCInCache(benchmark::State& state)
 }
 BENCHMARK(BM_CRCInCache);
 
-// A sampler's folder: many loops of 64 KiB, opened one after the other.
+// A sampler's folder: many loops of 64 KiB opened in turn.
 
 constexpr int kLoops = 1000;
 constexpr long kLoopSize = 65536;
@@ -155,7 +155,7 @@ void BM_OpenReadCloseBySystemCalls(benchmark::State& state)
 }
 BENCHMARK(BM_OpenReadCloseBySystemCalls)->Unit(benchmark::kMicrosecond);
 
-/// With a reference made from each path, and ten small reads through a cache of 16 KiB.
+/// With a reference made from each path and ten small reads through a cache of 16 KiB.
 void BM_OpenReadClose(benchmark::State& state)
 {
     const LoopFolder folder;

@@ -1,5 +1,5 @@
-// The registry of shared samples: a thousand files of one second, beside libsndfile reading them as floats, and what a
-// further client of a registered file costs.
+// The registry of shared samples: a thousand files of one second, compared with libsndfile reading them as floats; and
+// the cost of another client of a registered file.
 #include "LoopFiles.h"
 #include "Timing.h"
 #include "audiofile/CAudioFileIO.h"
@@ -58,7 +58,7 @@ bool readAllWithSndfile(const std::vector<CFileRef>& files)
     });
 }
 
-/// Both take turns; processor time, medians.
+/// Both alternate; processor time, medians.
 void RegisterFiles(benchmark::State& state)
 {
     const std::vector<CFileRef>& files = sampleFiles();
@@ -93,7 +93,7 @@ void RegisterFurtherClient(benchmark::State& state)
 }
 BENCHMARK(RegisterFurtherClient);
 
-/// What a further client cannot be spared: whether the file is still there.
+/// The minimum for another client: checking that the file still exists.
 void StatusOfTheFile(benchmark::State& state)
 {
     const char* path = sampleFiles().front().GetPath();

@@ -1,5 +1,5 @@
-// How cost grows with the length of a recording and with the number of its chunks: processor time, and where it matters
-// memory, at sizes ten times apart, and the exponent that fits them (1 is linear).
+// Growth of cost with the length of a recording and with the number of its chunks: processor time, and memory where it
+// matters, at sizes ten times apart, with the exponent that fits them (1 is linear).
 #include "Timing.h"
 #include "audiofile/CAudioFileIO.h"
 #include "audiofile/ContainerChanges.h"
@@ -28,7 +28,7 @@
 
 namespace {
 
-/// The slope of a straight line through the logarithms.
+/// Slope of a line through the logarithms.
 double exponentOf(const std::vector<std::pair<double, double>>& points)
 {
     double x = 0, y = 0, xx = 0, xy = 0;
@@ -42,8 +42,8 @@ double exponentOf(const std::vector<std::pair<double, double>>& points)
     return (n * xy - x * y) / (n * xx - x * x);
 }
 
-/// A stereo WAVE (RF64) file of 16 bits at 44.1 kHz. Its samples are a hole, in the place of which reads get the same
-/// second of noise again and again, from memory: a file of a day would be 15 GB.
+/// A stereo WAVE (RF64) file of 16 bits at 44.1 kHz. Its samples are a hole; reads get the same second of noise from
+/// memory instead, because a file of a day would have 15 GB.
 class LongRecording {
 public:
     explicit LongRecording(std::int64_t seconds)
@@ -115,7 +115,7 @@ bool makesOverview(const LongRecording& recording)
     return overview && overview->size() == static_cast<std::size_t>(OverviewBlockSize(file.Info().frames));
 }
 
-/// Peak memory of a process that makes the overview above that of one that makes none, in MiB.
+/// Peak memory, in MiB, of a process that makes the overview above that of one that does not.
 double memoryFor(const LongRecording& recording)
 {
     const auto peak = [&](bool works) {
@@ -159,8 +159,8 @@ BENCHMARK(OverviewsGrow)->Unit(benchmark::kSecond)->Iterations(1);
 
 constexpr FourCC kOne = fourCC("one "), kNote = fourCC("note");
 
-/// A file of so many small chunks behind a few samples, one of them "one " and a tenth "note"; written anew for each
-/// edit.
+/// A file with the given number of small chunks after a few samples, one of them "one " and a tenth "note"; written
+/// anew for each edit.
 class ManyChunks {
 public:
     ManyChunks(int kind, int count)
@@ -228,8 +228,8 @@ private:
     int notes_ = 0;
 };
 
-/// Adding a chunk, removing one, and removing all of a kind, each with opening the file and proving what came of it; of
-/// 1 to 1,000,000 chunks.
+/// Adding a chunk, removing one, and removing all of a kind, each including opening the file and checking the result;
+/// with 1 to 1,000,000 chunks.
 void ChunksGrow(benchmark::State& state)
 {
     const auto kind = static_cast<int>(state.range(0));
@@ -261,7 +261,7 @@ void ChunksGrow(benchmark::State& state)
             }
         }
     }
-    // Where opening the file is not most of it.
+    // Only where opening the file is not most of the work.
     for (std::size_t edit = 0; edit < edits; ++edit)
         state.counters[std::string(names[edit]) + "_exponent"] =
             exponentOf({points[edit].end() - 4, points[edit].end()});

@@ -1,5 +1,5 @@
-// What files are, beside others that tell it: `ktfiles info --json` over 400 mixed files as a process, beside exiftool
-// and mediainfo; and describing one compressed file, beside what FFmpeg takes to open it and to find its streams.
+// Describing files, compared with other programs: `ktfiles info --json` over 400 mixed files as a process against
+// exiftool and mediainfo; and describing one compressed file against FFmpeg opening it and finding its streams.
 #include "LoopFiles.h"
 #include "Timing.h"
 #include "audiofile/AudioFileInfo.h"
@@ -36,7 +36,7 @@ bool run(const fs::path& folder, const std::string& command)
     return std::system(line.c_str()) == 0;
 }
 
-/// A sound of that many seconds in each of the formats, made by ffmpeg where nothing is said; removed with the object.
+/// A sound of that length in each format, made by ffmpeg unless another encoder is named; removed with the object.
 class Sounds {
 public:
     explicit Sounds(int seconds)
@@ -48,7 +48,7 @@ public:
         if (!run(folder_.path(), "ffmpeg -f lavfi -i \"" + sound + "\" sound.wav"))
             std::abort();
     }
-    /// By another encoder, if one is named.
+    /// Made by another encoder if one is named.
     fs::path made(const std::string& name, const std::string& options, const std::string& encoder = "") const
     {
         const std::string command = encoder.empty() ? "ffmpeg -i sound.wav " + options + " -strict -2 " + name
@@ -74,7 +74,7 @@ constexpr Format kFormats[] = {
     {"opus", ""},
     {"oga", "-c:a flac"},
     {"wv", "", "wavpack"},
-    {"wv", ""}, // whose blocks have no checksums
+    {"wv", ""}, // blocks without checksums
     {"tta", ""},
     {"wma", ""},
     {"mka", "-c:a libvorbis"},
@@ -134,8 +134,8 @@ void InfoCommand(benchmark::State& state)
                           {"w64", ""},          {"wav", "-c:a adpcm_ms"},
                           {"au", ""},           {"mp3", "-ac 1"},
                           {"aac", ""},          {"ogg", ""},
-                          {"opus", ""},         {"wv", "", "wavpack"}, // of which the ends are asked
-                          {"wma", ""}};                                // for the decoder module
+                          {"opus", ""},         {"wv", "", "wavpack"}, // described by their ends
+                          {"wma", ""}};                                // described by the decoder module
     const auto mixed = std::span(all).first(static_cast<std::size_t>(state.range(0)));
     for (int i = 0; i < kFiles; ++i) {
         const std::size_t kind = static_cast<std::size_t>(i) % std::size(mixed);

@@ -30,7 +30,7 @@ void putChunk(ByteWriter& out, const Chunk& chunk)
     out.writeZeros(chunk.body.size() & 1);
 }
 
-/// A container of `kLoopFileSize` bytes: the chunks, and an overview as long as it takes.
+/// A container of `kLoopFileSize` bytes: the chunks, and an overview that fills it.
 Bytes container(FourCC id, FourCC formType, std::endian order, const std::array<Chunk, kLoopChunks - 1>& chunks)
 {
     ByteWriter out(order);
@@ -49,13 +49,13 @@ Bytes text(std::string_view characters)
     return {bytes.begin(), bytes.end()};
 }
 
-/// The title once more, where programs that know no loops look for it: an ID3v2.3 tag of one text frame.
+/// The title for programs that know no loops: an ID3v2.3 tag with one text frame.
 Bytes titleInID3()
 {
     ByteWriter out;
     out.write(bytesOf("ID3\x03"));
     out.writeZeros(5);
-    out.write(static_cast<std::uint8_t>(11 + kLoopTitle.size())); // of the frame, 7 bits
+    out.write(static_cast<std::uint8_t>(11 + kLoopTitle.size())); // size of the frame, 7 bits
     out.write(bytesOf("TIT2"));
     out.write(static_cast<std::uint32_t>(1 + kLoopTitle.size()));
     out.writeZeros(3); // flags, encoding

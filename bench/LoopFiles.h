@@ -1,4 +1,4 @@
-// Loops of 64 KiB with ten chunks, as a folder of them is scanned, and what no scan can avoid.
+// Loops of 64 KiB with ten chunks, as in a folder that is scanned, and the minimum that a scan must do.
 #pragma once
 
 #include "platform/core/Bytes.h"

@@ -1,5 +1,5 @@
-// `ktfiles meta --jsonl` over 2,000 WAVE files as a process, beside `exiftool -j` on the same files, and beside
-// `ktfiles scan` of as many loops: processor time, in turns.
+// `ktfiles meta --jsonl` over 2,000 WAVE files as a process, compared with `exiftool -j` on the same files and with
+// `ktfiles scan` on as many loops: processor time, in turns.
 #include "LoopFiles.h"
 #include "Timing.h"
 #include "audiofile/metadata/AcidChunk.h"
@@ -32,7 +32,7 @@ void putChunk(ByteWriter& out, FourCC id, BytesView body)
     out.writeZeros(body.size() & 1);
 }
 
-// What recorders, editors and makers of loops write, at the sizes that they have there.
+// The chunks of recorders, editors and loop makers, at typical sizes.
 
 void putBroadcast(ByteWriter& out, int number)
 {
@@ -118,7 +118,7 @@ void putLoop(ByteWriter& out)
     putChunk(out, fourCC("acid"), acid.write());
 }
 
-/// Recordings with everything ahead of the samples, or behind them; loops of samplers; edited sounds with markers.
+/// Recordings with all chunks before the samples or after them; loops of samplers; edited sounds with markers.
 Bytes waveFile(int number)
 {
     ByteWriter out(std::endian::little);
@@ -148,7 +148,7 @@ Bytes waveFile(int number)
     return file.take();
 }
 
-/// The processor time that a command takes on a folder.
+/// Processor time of a command on a folder.
 double secondsOf(benchmark::State& state, const char* command, const std::filesystem::path& folder)
 {
     const double before = processorSecondsOfChildren();

@@ -1,4 +1,4 @@
-// Names of audio files: extensions recognised and cut, types by extension.
+// Names of audio files: recognizing and cutting extensions, finding types by extension.
 #include "files/AudioFileNames.h"
 
 #include <benchmark/benchmark.h>
@@ -14,7 +14,7 @@ constexpr std::array kNames = {
     "Shaker Groove 120.aif", "Kick 01.wav", "Bass Line.L.wav", "Bass Line.R.wav", "Readme.txt", "Vocals Take 12.caf",
     "Strings.AIFF",          "Piano.mp3",   "Cover.jpeg",      "Mix.L.aif",       "Take.12",    "Guitar.m4a"};
 
-/// The name has to be there anew each time: cutting changes it.
+/// Copies the name each time, because cutting changes it.
 void CutKnownExtension(benchmark::State& state)
 {
     std::array<std::size_t, kNames.size()> sizes;

@@ -1,5 +1,5 @@
-// Waveform overviews: of whole files, beside what must be done anyway, which is reading their bytes; and of floats that
-// stream by, beside converting each before it is folded. Processor time throughout; files lie in the page cache.
+// Waveform overviews: of whole files, compared with reading their bytes; and of streamed floats, compared with
+// converting each before it is folded. Processor time throughout; files are in the page cache.
 #include "Timing.h"
 #include "audiofile/CAudioFileIO.h"
 #include "loops/overview/MDOverview.h"
@@ -27,7 +27,7 @@ namespace {
 
 struct Kind {
     const char* name;
-    int format; // libsndfile's, by which the files are written
+    int format; // libsndfile's format for writing the file
     int channels;
 };
 constexpr std::array<Kind, 5> kKinds{{{"wav24x2", SF_FORMAT_WAV | SF_FORMAT_PCM_24, 2},
@@ -36,7 +36,7 @@ constexpr std::array<Kind, 5> kKinds{{{"wav24x2", SF_FORMAT_WAV | SF_FORMAT_PCM_
                                       {"wav24x24", SF_FORMAT_RF64 | SF_FORMAT_PCM_24, 24},
                                       {"caf32fx2le", SF_FORMAT_CAF | SF_FORMAT_FLOAT | SF_ENDIAN_LITTLE, 2}}};
 
-/// So many minutes of noise, removed at the end.
+/// The given number of minutes of noise, removed at the end.
 class NoiseFile {
 public:
     NoiseFile(const Kind& kind, int minutes)
@@ -110,12 +110,12 @@ void createOverview(const CFileRef& ref)
     benchmark::DoNotOptimize(overview->data());
 }
 
-/// Rate beside a bare pread loop (at least 0.8), and beside libsndfile (at least 2, of floats 1.3).
+/// Rate compared with a bare pread loop (at least 0.8) and with libsndfile (at least 2, for floats 1.3).
 void CreateOverview(benchmark::State& state)
 {
     const Kind& kind = kKinds[static_cast<std::size_t>(state.range(0))];
     const NoiseFile file(kind, static_cast<int>(state.range(1)));
-    readBytes(file.path()); // into the page cache
+    readBytes(file.path()); // loads the page cache
     double bare = 0, sndfile = 0, ours = 0;
     for (auto _ : state) {
         bare += processorSeconds([&] { readBytes(file.path()); });
@@ -136,11 +136,11 @@ BENCHMARK(CreateOverview)
     ->Unit(benchmark::kMillisecond)
     ->MinTime(0.3);
 
-/// Peak memory of a process that makes the overview, above that of one that makes none, in MiB; at most 8.
+/// Peak memory, in MiB, of a process that makes the overview above that of one that does not; at most 8.
 void CreateOverviewMemory(benchmark::State& state)
 {
     const NoiseFile file(kKinds[0], static_cast<int>(state.range(0)));
-    malloc_trim(0); // memory left over here would serve the child for nothing
+    malloc_trim(0); // otherwise the child would reuse free memory of this process
     const auto peak = [&](bool works) {
         const pid_t child = fork();
         if (child == 0) {
@@ -160,7 +160,7 @@ void CreateOverviewMemory(benchmark::State& state)
 }
 BENCHMARK(CreateOverviewMemory)->ArgName("minutes")->Arg(10)->Arg(60)->Iterations(1);
 
-/// The reference: each float becomes a byte, and the bytes are folded.
+/// The reference: converts each float to a byte, then folds the bytes.
 void addPlainly(MDOverview& overview, const float* samples, long start, long frames, int channels)
 {
     constexpr platform::SampleFormat bytes{8, false, false, std::endian::native};

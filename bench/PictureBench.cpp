@@ -1,5 +1,5 @@
-// Drawing a waveform of 1,800 x 280 as a PNG and as an SVG, from the overview of a 10-minute file, stored and read each
-// time, and from that of 12 hours, which is there.
+// Drawing a waveform of 1,800 x 280 as PNG and SVG, from the stored overview of a 10-minute file, read each time, and
+// from one of 12 hours in memory.
 #include "audiofile/CAudioFileIO.h"
 #include "loops/overview/StoredOverview.h"
 #include "tool/overview/PNGPicture.h"
@@ -17,7 +17,7 @@ namespace {
 
 constexpr double kRate = 48000;
 
-/// Noise that swells and fades, as busy as music: every column ends elsewhere.
+/// Swelling and fading noise, as irregular as music: every column ends at another height.
 KTMem noisyOverview(std::int64_t frames)
 {
     KTMem block(OverviewBlockSize(frames));
@@ -42,7 +42,7 @@ WaveformPicture drawn(const KTMem& block, const PictureSettings& settings = {})
     return pictureOf(frame, drawnPoints(waveform, 0, frames, {}, frame), settings);
 }
 
-/// A WAVE file of silence, mono, 16 bits, that holds an overview of noise.
+/// A WAVE file of mono 16-bit silence that holds an overview of noise.
 class FileWithOverview {
 public:
     explicit FileWithOverview(std::int64_t frames)

@@ -1,4 +1,4 @@
-// What a project with many alternatives uses, and the property lists that say so.
+// The files used by a project with many alternatives, and the property lists that name them.
 #include "Timing.h"
 #include "platform/PropertyList.h"
 #include "project/ProjectInformation.h"
@@ -16,10 +16,10 @@ namespace {
 using namespace platform;
 
 constexpr int kAlternatives = 50;
-constexpr int kPaths = 20000; // of each alternative
+constexpr int kPaths = 20000; // per alternative
 constexpr std::size_t kListSize = 10 << 20;
 
-/// Paths as a project stores them; `shared` of 20 are those of every alternative.
+/// Paths as a project stores them; `shared` of 20 are the same in every alternative.
 Dictionary metaDataOf(int alternative, int shared)
 {
     Dictionary metaData{{"SampleRate", 48000}, {"BeatsPerMinute", 120.5}, {"NumberOfTracks", 64}, {"SongKey", "C"}};
@@ -71,7 +71,7 @@ private:
     std::vector<Bytes> lists_;
 };
 
-/// Beside parsing the 50 lists, which are in memory, one after the other. 20 of 20: every alternative uses the same.
+/// Compared with parsing the 50 lists from memory in turn. 20 of 20: every alternative uses the same files.
 void AllUsedFiles(benchmark::State& state)
 {
     const LargeProject project(static_cast<int>(state.range(0)));
@@ -113,7 +113,7 @@ Value largeList(PropertyListFormat format)
 void ReadList(benchmark::State& state, PropertyListFormat format)
 {
     const Bytes bytes = *writePropertyList(largeList(format), format);
-    for (auto _ : state) { // the release of the value is not parsing
+    for (auto _ : state) { // destroying the value is not parsing
         std::optional<Value> value;
         state.SetIterationTime(seconds([&] { value = readPropertyList(bytes); }));
         benchmark::DoNotOptimize(value);

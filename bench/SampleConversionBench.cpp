@@ -1,4 +1,4 @@
-// Samples to floats and back, and their extremes: 256 KiB of samples, in the cache.
+// Converting samples to floats and back, and finding their extremes: 256 KiB of samples in the cache.
 #include "media/samples/SampleConversion.h"
 #include "media/samples/SampleExtremes.h"
 
@@ -44,7 +44,7 @@ void writeSamples(benchmark::State& state)
     state.SetBytesProcessed(static_cast<std::int64_t>(state.iterations()) * std::int64_t{kBytes});
 }
 
-// Runs as overviews have them: 256 frames of stereo.
+// Runs as in overviews: 256 frames of stereo.
 void findExtremes(benchmark::State& state)
 {
     constexpr std::size_t run = 512;
@@ -59,7 +59,7 @@ void findExtremes(benchmark::State& state)
     state.SetBytesProcessed(static_cast<std::int64_t>(state.iterations()) * std::int64_t{kBytes});
 }
 
-// Bits of a sample (negative: floats), and whether they are big-endian.
+// Bits per sample (negative: floats) and byte order.
 void formats(benchmark::internal::Benchmark* bench)
 {
     bench->ArgNames({"bits", "big"})->ArgsProduct({{8, 16, 24, 32, -32, -64}, {0, 1}});

@@ -1,5 +1,5 @@
-// Scanning a folder of loops: every file is opened from its path, its chunks are listed, one is read, the file closed.
-// Beside it what cannot be avoided (open, one read of 16 KiB, close), and the same work through libsndfile.
+// Scanning a folder of loops: opens every file by its path, lists its chunks, reads one, closes the file. Compared with
+// the minimum (open, one read of 16 KiB, close), and with the same work in libsndfile.
 #include "LoopFiles.h"
 #include "audiofile/CAudioFileIO.h"
 
@@ -11,7 +11,7 @@
 namespace {
 
 constexpr int kFilesOfAKind = 2000;
-constexpr FourCC kRead = fourCC("basc"); // the chunk that is read, behind the samples
+constexpr FourCC kRead = fourCC("basc"); // the chunk to read, after the samples
 constexpr std::size_t kReadSize = 82;
 
 /// The files, half of them WAVE, half AIFF.
@@ -29,7 +29,7 @@ const std::vector<std::string>& loopPaths()
     return paths;
 }
 
-// Each returns the bytes of the chunk that it read.
+// Each returns the size of the chunk that it read.
 
 std::size_t touch(const std::string& path)
 {
@@ -61,10 +61,10 @@ std::size_t scanWithSndfile(const std::string& path)
     chunk = {"basc", 4, body.size(), body.data()};
     const bool read = sf_get_chunk_data(sf_get_chunk_iterator(file, &chunk), &chunk) == SF_ERR_NO_ERROR;
     sf_close(file);
-    return read && chunks == kLoopChunks + 1 ? chunk.datalen : 0; // it counts the container too
+    return read && chunks == kLoopChunks + 1 ? chunk.datalen : 0; // it counts the container as a chunk
 }
 
-/// The processor time of one pass over all files.
+/// Processor time of one pass over all files.
 template <class Road>
 double pass(benchmark::State& state, const char* name, Road road)
 {
@@ -76,8 +76,7 @@ double pass(benchmark::State& state, const char* name, Road road)
     return cpuSeconds() - start;
 }
 
-/// The roads take turns, so that page cache and processor treat them alike. The time of the benchmark is that of our
-/// own.
+/// The ways alternate, so that page cache and processor treat them alike. The benchmark's time is ours.
 void ScanLoops(benchmark::State& state)
 {
     const auto files = static_cast<double>(loopPaths().size());

@@ -1,5 +1,5 @@
-// `ktfiles scan` on 20,000 loops, as a process, beside what the library alone can do on the same files: one thread per
-// core, each with a share of the paths known beforehand, every loop chunk of every file read, nothing printed.
+// `ktfiles scan` on 20,000 loops as a process, compared with the library alone on the same files: one thread per core,
+// each with a share of the paths, which are known in advance, every loop chunk of every file read, nothing printed.
 #include "LoopFiles.h"
 #include "loops/VireoLoopChunksManager.h"
 

@@ -1,4 +1,4 @@
-// Streams in blocks of 512 frames, as an audio engine asks for them, beside CAudioFileIO reading the same blocks.
+// Streams in blocks of 512 frames, as in an audio engine, compared with CAudioFileIO reading the same blocks.
 #include "audiofile/CAudioFileIO.h"
 #include "audiofile/XStream.h"
 

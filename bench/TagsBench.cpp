@@ -1,5 +1,5 @@
-// The tags of a folder of AIFF loops: every chunk that the manager knows is read from every file. Beside it what cannot
-// be avoided (open, one read of 16 KiB, close), and the title alone through TagLib.
+// The tags of a folder of AIFF loops: reads every chunk that the manager knows from every file. Compared with the
+// minimum (open, one read of 16 KiB, close), and with reading only the title with TagLib.
 #include "LoopFiles.h"
 #include "loops/VireoLoopChunksManager.h"
 #include "platform/core/Packed.h"
@@ -35,7 +35,7 @@ bool readTitleWithTagLib(const std::string& path)
     return file.isValid() && file.tag() != nullptr && file.tag()->title() == TagLib::String(std::string(kLoopTitle));
 }
 
-/// Moves what lies behind the samples back, so that there are `size` bytes of these.
+/// Moves what follows the samples back, to make room for `size` bytes of samples.
 void enlargeSamples(const std::string& path, const Bytes& loop, std::int64_t size)
 {
     const BytesView idOfSamples = bytesOf("SSND");
@@ -89,8 +89,8 @@ void ReadTags(benchmark::State& state)
 }
 BENCHMARK(ReadTags)->UseManualTime()->Unit(benchmark::kMillisecond)->MinTime(2);
 
-/// One number of an AIFF loop whose tags stand behind as many bytes of samples as the argument says, most of them a
-/// hole: opened, changed in place, closed. The time must be the same.
+/// Opens an AIFF loop, changes one number of its tags in place, closes it. The tags follow as many bytes of samples as
+/// the argument says, mostly a hole: the time must not depend on it.
 void SetTag(benchmark::State& state)
 {
     const BenchFolder folder;

@@ -1,4 +1,4 @@
-// What the benchmarks measure time by.
+// Clocks of the benchmarks.
 #pragma once
 
 #include <algorithm>
@@ -8,7 +8,7 @@
 #include <sys/resource.h>
 #include <time.h>
 
-/// Seconds that the work takes on the wall clock.
+/// Wall-clock seconds of the work.
 double seconds(const auto& work)
 {
     const auto start = std::chrono::steady_clock::now();
@@ -23,7 +23,7 @@ inline double secondsOn(clockid_t clock)
     return static_cast<double>(now.tv_sec) + 1e-9 * static_cast<double>(now.tv_nsec);
 }
 
-/// Seconds of processor time that the work takes in all threads of the process.
+/// Processor seconds of the work in all threads of the process.
 double processorSeconds(const auto& work)
 {
     const double start = secondsOn(CLOCK_PROCESS_CPUTIME_ID);
@@ -31,7 +31,7 @@ double processorSeconds(const auto& work)
     return secondsOn(CLOCK_PROCESS_CPUTIME_ID) - start;
 }
 
-/// Seconds of processor time of the children that have ended.
+/// Processor seconds of all children that have ended.
 inline double processorSecondsOfChildren()
 {
     rusage used{};
@@ -42,7 +42,7 @@ inline double processorSecondsOfChildren()
     return inSeconds(used.ru_utime) + inSeconds(used.ru_stime);
 }
 
-/// The upper one of two in the middle.
+/// Of an even number of values, the upper middle one.
 inline double median(std::vector<double> values)
 {
     std::ranges::nth_element(values, values.begin() + std::ssize(values) / 2);

@@ -1,4 +1,4 @@
-// A process that links libxml2 alone, reads the first bytes of a file and ends.
+// A process that only links libxml2, reads the first bytes of a file and ends.
 #include <libxml/parser.h>
 
 #include <cstdio>

@@ -58,7 +58,7 @@ TEST(ADMDocument, EveryElementTwiceIsReplaced)
     EXPECT_EQ(document->audioContents().begin()->audioObjects().at(0), &narrator);
 }
 
-// What a parse left open when it failed is no part of the next.
+// Elements that a failed parse left open do not become part of the next one.
 TEST(ADMDocument, ASecondParseStartsAnew)
 {
     const auto parse = [](ADMDocument& document, const std::string& text) {
@@ -112,7 +112,7 @@ TEST(ADMDocument, OffsetsOfAnObjectByTheirCoordinates)
 
 TEST(ADMDocument, SubElementsAreFlattened)
 {
-    // An inner sub-element is given to the ADM element before the outer one; elements within others still count.
+    // An inner sub-element goes to the ADM element before the outer one does; nested elements still count.
     const auto document = documentOf(enveloped(
         R"(<position coordinate="X">stray</position>
         <audioProgramme audioProgrammeID="APR_1001" audioProgrammeName="P">dropped
@@ -125,7 +125,7 @@ TEST(ADMDocument, SubElementsAreFlattened)
     const ADMAudioProgramme& programme = *document->audioProgrammes().begin();
     EXPECT_EQ(programme.audioContentIDs(), (std::vector<std::string>{"ACO_1002", "ACO_1001"}));
     EXPECT_EQ(programme.audioContents().at(0)->audioContentName(), "2");
-    EXPECT_TRUE(document->audioContents().find("ACO_1002")->audioObjectIDRefs().empty()); // a prefix makes another name
+    EXPECT_TRUE(document->audioContents().find("ACO_1002")->audioObjectIDRefs().empty()); // another name by its prefix
 }
 
 TEST(ADMDocument, ShapesOfText)
@@ -184,7 +184,7 @@ TEST(ADMDocument, ProblemsLeaveTheParseByName)
 
 TEST(ADMDocument, CutAtEveryByte)
 {
-    // Elements that were complete stay, nothing leaks, and nothing but the whole document is taken for whole.
+    // Complete elements are kept, nothing leaks, and only the whole document counts as whole.
     const std::string whole = wholeDocument();
     const std::string_view text = std::string_view(whole).substr(0, whole.rfind('>') + 1);
     std::size_t most = 0;
@@ -202,7 +202,7 @@ TEST(ADMDocument, CutAtEveryByte)
 
 class Lenient : public testing::Test {
 protected:
-    /// Parses, and keeps what was told as "line:column kind ID: text".
+    /// Parses, and records problems as "line:column kind ID: text".
     bool parse(std::string_view text, const ADMDocumentOptions& options)
     {
         document = documentOf(text);
@@ -240,7 +240,7 @@ TEST_F(Lenient, EverythingLetPassIsTold)
               (std::vector<ADMAudioTrackUID*>{nullptr, nullptr, document->audioTrackUIDs().find("ATU_00000001")}));
     const auto& blocks = document->audioChannelFormats().begin()->audioBlockFormat();
     ASSERT_EQ(blocks.size(), 1U);
-    EXPECT_EQ(blocks[0]->gain(), 1); // nothing of the block that was left out went elsewhere
+    EXPECT_EQ(blocks[0]->gain(), 1); // nothing of the omitted block was assigned elsewhere
     EXPECT_EQ(blocks[0]->rtime(), 50);
     EXPECT_EQ(blocks[0]->exactRtime(), 500000);
     EXPECT_EQ(blocks[0]->exactDuration(), 1250000);

@@ -86,7 +86,7 @@ TEST(ADMElements, ATrackFormatHasOneStreamFormat)
         EXPECT_EQ(problem.reason(), "only one audioStreamFormatIDRef expected");
         EXPECT_EQ(problem.userInfo(), (platform::Dictionary{{"audioTrackFormat", "AT_00010001_01"}}));
     }
-    ADMAudioTrackUID uid({{"UID", "ATU_00000001"}}); // where a later reference replaces the earlier one
+    ADMAudioTrackUID uid({{"UID", "ATU_00000001"}}); // a later reference replaces an earlier one
     uid.setSubElement("audioTrackFormatIDRef", "AT_1", {});
     uid.setSubElement("audioTrackFormatIDRef", "AT_2", {});
     EXPECT_EQ(uid.audioTrackFormatIDRef(), "AT_2");
@@ -138,7 +138,7 @@ TEST(ADMElementTable, ManyIDsOfAnyLength)
     EXPECT_EQ(table.find(std::string(100, 'x')), nullptr);
 }
 
-/// Finds nothing, and knows what it was told ahead and what it was asked.
+/// Resolves nothing, and records announcements and questions.
 struct Listener : ADMElementResolver {
     ADMElement* findADMElementRef(std::optional<std::string_view> id, std::optional<std::string_view> prefix) override
     {
@@ -174,7 +174,7 @@ TEST(ADMElements, EveryReferenceIsAnnouncedOnceAndAskedForInOrder)
     EXPECT_EQ(object.audioTrackUIDs().size(), ids.size());
 }
 
-/// Finds the same element whatever is looked for.
+/// Resolves every reference to the same element.
 struct Misleading : ADMDocument {
     Misleading() : ADMDocument(nullptr) {}
     ADMElement* findADMElementRef(std::optional<std::string_view>, std::optional<std::string_view>) override
@@ -197,7 +197,7 @@ TEST(ADMElements, WhatADerivedDocumentFindsIsTakenForNoOtherClass)
     EXPECT_EQ(object.audioPackFormats()[0], nullptr);
 }
 
-/// A different one for each number, all of the same hash: the standard library's function run backwards.
+/// Different IDs for different numbers, all with the same hash: the standard library's function inverted.
 std::string collidingID(std::uint64_t number)
 {
     const auto text = [](std::uint64_t word) { return std::string(reinterpret_cast<const char*>(&word), sizeof word); };

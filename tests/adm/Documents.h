@@ -9,14 +9,14 @@
 #include <string>
 #include <string_view>
 
-/// The elements within the envelopes that documents have.
+/// Wraps the elements in a document's envelopes.
 inline std::string enveloped(std::string_view elements)
 {
     return "<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n<ebuCoreMain><coreMetadata><format><audioFormatExtended>" +
            std::string(elements) + "</audioFormatExtended></format></coreMetadata></ebuCoreMain>";
 }
 
-/// An element with its ID and a name.
+/// An element with an ID and a name.
 inline std::string named(const std::string& kind, const std::string& id, const std::string& more = "",
                          const std::string& inner = "")
 {
@@ -39,7 +39,7 @@ inline std::unique_ptr<ADMDocument> documentOf(std::string_view text)
     return ADMDocument::initWithADMData(Bytes(bytes.begin(), bytes.end()));
 }
 
-/// "Name: reason" of what `work` raises; empty when it raises nothing.
+/// "Name: reason" of the exception that `work` raises; empty if it raises none.
 template <class Work>
 std::string raised(Work work)
 {
@@ -51,7 +51,7 @@ std::string raised(Work work)
     return {};
 }
 
-/// A whole small document: every element, nearly every reference.
+/// A small but whole document with every kind of element and nearly every reference.
 inline std::string wholeDocument()
 {
     return std::string(textOf(readFile(mediaPath("harbour.xml"))));

@@ -1,5 +1,5 @@
-// One question, one answer: whatever a file is, its description, its streams and its overview agree on type, rate,
-// channels and frames, or say why not.
+// For every file, its description, its streams and its overview agree on type, rate, channels and frames, or say why
+// not.
 #include "agreement/Answers.h"
 
 #include "platform/core/Status.h"
@@ -22,7 +22,7 @@ class Agreement : public ::testing::Test {
 protected:
     void expectAgreement(const std::string& path, const std::string& what)
     {
-        constexpr int most = 30; // disagreements that are shown
+        constexpr int most = 30; // disagreements to show
         ++count_;
         const std::string why = disagreement(path);
         if (!why.empty() && ++failures_ <= most)
@@ -33,7 +33,7 @@ protected:
         expectAgreement(folder_.write("file", content), what);
     }
 
-    /// The file itself, cut at every 64th of its length, and with its header damaged in a number of ways.
+    /// Checks the file itself, its first parts of n/64, and copies with damaged headers.
     void expectAgreementOfVariants(const Bytes& content, const std::string& what)
     {
         constexpr std::size_t kCuts = 64, kMutants = 20, kHeader = 256, kBeginning = 16;
@@ -46,14 +46,14 @@ protected:
             const auto below = [&](std::size_t end) { return random() % end; };
             Bytes mutant = content;
             for (std::size_t changes = 1 + below(3); changes > 0; --changes) {
-                // Mostly ahead; tables stand at the end, too.
+                // Mostly in the header; some files have tables at their end.
                 const std::size_t header = std::min(kHeader, mutant.size());
                 const std::size_t at = below(4) > 0 ? below(header) : mutant.size() - 1 - below(header);
                 const std::byte values[] = {mutant[at] ^ std::byte{1} << below(8), std::byte{0}, std::byte{0xFF},
                                             std::byte{0x7F}};
                 mutant[at] = values[below(std::size(values))];
             }
-            // What no longer begins as any file does may be guessed by the decoder's demultiplexers alone.
+            // A file that no longer begins like any format is left to guesses of the decoder's demultiplexers.
             const std::string path = folder_.write("file", mutant);
             const bool isChanged = !std::equal(
                 mutant.begin(), mutant.begin() + static_cast<std::ptrdiff_t>(std::min(kBeginning, mutant.size())),
@@ -216,7 +216,7 @@ TEST_F(Agreement, OnMP3WhoseFirstFramesMislead)
 {
     folder_.write("IN.wav", source(48000, 2, 16));
     ASSERT_TRUE(runs(folder_, "lame --quiet -t -b 128 IN.wav bare.mp3 && lame --quiet -b 128 IN.wav told.mp3"));
-    constexpr std::size_t frame = 384; // bytes of one
+    constexpr std::size_t frame = 384; // bytes of a frame
     const Bytes bare = readFile(folder_ / "bare.mp3"), told = readFile(folder_ / "told.mp3");
     const auto join = [](Bytes ahead, std::size_t padding, const Bytes& file) {
         ahead.resize(ahead.size() + padding);
@@ -230,7 +230,7 @@ TEST_F(Agreement, OnMP3WhoseFirstFramesMislead)
     const Bytes other{std::byte{0xFF}, std::byte{0xFB}, std::byte{0x90}, std::byte{0x64}}; // 44.1 kHz, 417 bytes
     const Bytes same(bare.begin(), bare.begin() + 4);
     const std::int64_t all = static_cast<std::int64_t>(bare.size() / frame) * 1152, lessOne = all - 1152;
-    const std::int64_t sound = 12000; // where the frame that says so is understood
+    const std::int64_t sound = 12000; // if the describing frame is understood
     const std::pair<const char*, std::pair<Bytes, std::int64_t>> files[] = {
         {"a header of another stream ahead", {join(other, 100, bare), all}},
         {"a header of the stream ahead", {join(same, 100, bare), all}},
@@ -253,7 +253,7 @@ TEST_F(Agreement, OnMP3WhoseFirstFramesMislead)
         const Answer answer = describedFile(folder_ / "file");
         EXPECT_EQ(std::pair(answer.frames, answer.rate), std::pair(file.second, 48000.0)) << what;
         std::ignore = folder_.write("file.mp3", file.first);
-        // Which drops a frame or two where it finds its way again, or plays what stands around the sound.
+        // It drops a frame or two where it resynchronizes, or plays what surrounds the sound.
         const std::string judge = "mpg123 -q -w OUT.wav file.mp3; lost=$((" + std::to_string(file.second) +
                                   " - $(soxi -s OUT.wav))); test $lost -gt -3456 -a $lost -lt 3456";
         EXPECT_TRUE(runs(folder_, judge)) << what << ", by mpg123";
@@ -262,7 +262,7 @@ TEST_F(Agreement, OnMP3WhoseFirstFramesMislead)
 
 struct Encoding {
     const char* extension;
-    const char* command; // of IN, OUT
+    const char* command; // with IN and OUT
 };
 
 void PrintTo(const Encoding& encoding, std::ostream* out)
@@ -289,11 +289,12 @@ TEST_P(AgreementOnFilesOf, WholeCutAndDamaged)
             const std::string to = std::string("made.") + encoding.extension;
             command.replace(command.find("IN"), 2, from.name).replace(command.find("OUT"), 3, to);
             fs::remove(folder_ / to);
-            // Not every coding has every rate, or six channels.
+            // Not every coding supports every rate, or six channels.
             if (!runs(folder_, command) || !fs::exists(folder_ / to) || fs::file_size(folder_ / to) == 0)
                 continue;
             const Bytes content = readFile(folder_ / to);
-            // What is begun as a coding of this library's and no container is known by its first bytes alone.
+            // Files that begin like a coding that the library reads itself, but no container, are known by their first
+            // bytes only.
             if (made++ == 0)
                 expectAgreementOfVariants(content, command);
             else

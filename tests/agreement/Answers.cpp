@@ -24,7 +24,7 @@ T propertyOf(void* stream, FourCC id)
     return XStreamGetProperty(stream, id, &size, &value) == kStatusOK ? value : T{};
 }
 
-/// How many frames come until none comes any more; a status below 0 when they cannot be read.
+/// Reads to the end and returns the number of frames; a negative status if they cannot be read.
 std::int64_t framesRead(void* stream, std::uint32_t bytesPerFrame)
 {
     constexpr std::uint32_t most = 65536;
@@ -97,10 +97,10 @@ Answer streamedFile(const std::string& path)
     answer.speakers =
         static_cast<platform::ConvertingReader*>(static_cast<platform::AudioHandle*>(opened))->facts().speakers;
     const std::int64_t read = framesRead(opened, format.bytesPerFrame);
-    if (read < 0) // says why not
+    if (read < 0) // the status says why not
         answer.status = static_cast<std::int32_t>(read);
     else if (read != answer.frames)
-        answer.frames = -read; // as no road says
+        answer.frames = -read; // no way reports a negative number
     return answer;
 }
 
@@ -129,7 +129,7 @@ std::string disagreement(const std::string& path)
         return offersSound || overview.status == kStatusOK ? all : "";
     }
     const bool isEmpty = streamed.frames == 0 && overview.status == kStatusEndOfFile; // nothing to show
-    // A container may say what its coding does not, and the other way round.
+    // A container may state what its coding does not, and vice versa.
     const bool isContained =
         described.type == fourCC("WAVE") || described.type == fourCC("AIFF") || described.type == fourCC("caff");
     const bool areSaid = !isContained || (described.speakers != 0 && streamed.speakers != 0);

@@ -1,4 +1,4 @@
-// MP4 files that say by a tag alone which of their frames are sound, as older encoders write them.
+// MP4 files in which only a tag tells which frames are sound, as older encoders write them.
 #include "audiofile/CAudioFileIO.h"
 
 #include "platform/core/ByteWriter.h"
@@ -31,7 +31,7 @@ std::size_t typeOf(const Bytes& file, std::string_view type)
     return at;
 }
 
-/// The movie box, which is the file's last, without its edits and with the gapless item.
+/// Rewrites the movie box, the last one in the file, with the gapless item in place of its edits.
 void replaceEditsByGaplessItem(Bytes& file, std::string_view value)
 {
     const Bytes zeros(8);
@@ -58,7 +58,7 @@ std::vector<float> framesOf(const std::string& path)
 
 } // namespace
 
-// The judge decodes the file as it was, with its edits: 1,024 frames of priming ahead of 20,000.
+// The judge decodes the original file, with its edits: 1,024 frames of priming before 20,000.
 TEST(Gapless, TheItemTakesPrimingAndPaddingOff)
 {
     const TemporaryFolder folder;

@@ -1,4 +1,4 @@
-// How often operator new was called in this test program.
+// Counts the calls of operator new in this test program.
 #pragma once
 
 #include <cstddef>

@@ -1,4 +1,4 @@
-// Digests of sound: the samples alone, whatever stands beside them.
+// Digests of the sound: they cover only the samples.
 #include "audiofile/AudioDigest.h"
 
 #include "support/ContainerBuilder.h"

@@ -22,13 +22,13 @@ Bytes media(const std::string& name)
     return readFile(mediaPath(name));
 }
 
-/// WAVE as far as the samples.
+/// A WAVE file up to its samples.
 ContainerBuilder wave(const Bytes& format = waveFormat(1, 2, 8000, 4, 16))
 {
     return ContainerBuilder("RIFF").chunk("fmt ", format);
 }
 
-/// Ten frames, their size in the "ds64".
+/// Ten frames whose size is in the "ds64".
 Bytes wave64(std::string_view id, std::uint64_t riffSize, std::uint64_t dataSize)
 {
     return ContainerBuilder(id)
@@ -78,7 +78,7 @@ TEST(AudioFileInfo, TakesSampleWidthsAndTagsFromTheWAVEFormat)
     };
     EXPECT_EQ(withFormat(1, 2, 6, 20).bitsPerSample, 24); // left-aligned in 3 bytes
     EXPECT_EQ(withFormat(1, 2, 8, 24).bitsPerSample, 32); // left-aligned in 4
-    EXPECT_EQ(withFormat(1, 2, 0, 16).frames, 12);        // no frame size: the bits say it
+    EXPECT_EQ(withFormat(1, 2, 0, 16).frames, 12);        // without a frame size, the bits determine it
     EXPECT_EQ(withFormat(7, 2, 2, 8).frames, 24);         // mu-law without a "fact"
     EXPECT_TRUE(withFormat(7, 2, 2, 8).compressed);
     EXPECT_FALSE(withFormat(1, 0, 4, 16).IsLinearPCM());
@@ -108,7 +108,7 @@ struct ExtendedFloat {
     std::uint64_t significand = 0xAC44000000000000; // 44100
 };
 
-/// AIFF as far as the samples; of a compression type, if any.
+/// An AIFF file up to its samples, with a compression type if one is given.
 ContainerBuilder aiff(std::uint32_t frames, int bits = 16, std::string_view type = "", ExtendedFloat rate = {})
 {
     ByteWriter common;
@@ -185,7 +185,7 @@ TEST(AudioFileInfo, BoundsAIFFSoundDataByTheFile)
     EXPECT_EQ(status, kStatusEndOfFile);
 }
 
-/// CAF as far as the samples.
+/// A CAF file up to its samples.
 ContainerBuilder caf(const std::array<std::uint32_t, 5>& numbers, std::string_view format = "lpcm", double rate = 44100)
 {
     return ContainerBuilder("caff").chunk("desc", cafDescription(rate, format, numbers));
@@ -235,7 +235,7 @@ TEST(AudioFileInfo, RecognisesWhatItCannotRead)
     }
 }
 
-// Every truncation, and every byte of the headers set to 0xFF, 0x7F and 0: no crash, and no frame that is not there.
+// Every truncation, and every header byte set to 0xFF, 0x7F and 0: no crash, and no frame that does not exist.
 TEST(AudioFileInfo, SurvivesDamage)
 {
     const auto check = [](BytesView content) {

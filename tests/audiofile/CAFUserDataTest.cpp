@@ -21,8 +21,7 @@ const unsigned char* bytesOfUUID(const std::string& uuid)
 
 class CAFUserData : public testing::Test {
 protected:
-    /// Opens a file with an item for each letter, of which the body is the letter again; '.' is one too short for a
-    /// UUID.
+    /// Opens a file with an item for each letter, whose body is the same letter; for '.', an item too short for a UUID.
     void perform(std::string_view letters, const std::function<void(platform::AudioFile&)>& block)
     {
         ContainerBuilder builder("caff");

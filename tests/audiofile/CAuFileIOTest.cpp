@@ -1,4 +1,4 @@
-// The older audio-file class: its files read by libsndfile and the other way round, its chunks, its oddities.
+// The older audio-file class: its files read by libsndfile and vice versa, its chunks, its oddities.
 #include "audiofile/CAuFileIO.h"
 
 #include "SoundFile.h"
@@ -268,7 +268,7 @@ TEST(CAuFileIO, ChunksAreUserDataThatTheContainerClassFinds)
         chunk.size = -1;
         EXPECT_EQ(file.AddChunk(chunk, 0), -1);
     }
-    // An item that is there but cannot be read.
+    // An item that exists but cannot be read.
     CChunkData chunk = chunkOf(fourCC("note"), std::string(100000, 'n'));
     CAuFileIO file;
     ASSERT_EQ(file.Open(::file(path), true), 0);

@@ -1,4 +1,4 @@
-// Adding and removing chunks where sizes need more than 32 bits, or a container cannot say them.
+// Adding and removing chunks whose sizes need more than 32 bits, or that a container cannot state.
 #include "audiofile/CAudioFileIO.h"
 
 #include "support/ContainerBuilder.h"
@@ -21,7 +21,7 @@ ContainerBuilder wave()
     return ContainerBuilder("RIFF").format().chunk("data", "1234");
 }
 
-/// A file that is all holes behind what is given.
+/// A file that is a hole after the given start.
 std::string sparseFile(const TemporaryFolder& folder, const Bytes& start, std::int64_t length)
 {
     const std::string path = folder.write("sparse.wav", start);
@@ -46,7 +46,7 @@ TEST(ChunkEditSizes, BecomesRF64AndRIFFAgain)
         ASSERT_EQ(file.ReadExtendedFileHeader(header), 0);
         EXPECT_TRUE(header.id == kRF64 && header.HasValidDs64() && header.size == 0xFFFFFFFF);
         EXPECT_EQ(header.EffectiveSize(), file.GetEOF() - 8);
-        EXPECT_EQ(header.dataSize, dataSize); // other readers look here whatever the chunk says
+        EXPECT_EQ(header.dataSize, dataSize); // other readers look only here
         EXPECT_EQ(header.sampleCount, dataSize / 2);
         EXPECT_EQ(header.tableLength, 0u);
     }
@@ -86,7 +86,7 @@ TEST(ChunkEditSizes, AFileThatStopsBeing64BitKeepsItsSizes)
 
 const platform::SystemCalls* realCalls = nullptr;
 
-/// Bodies of gigabytes are not written, the file only gets as long.
+/// Bodies of gigabytes are not written; the file only gets their length.
 std::int64_t writeWithHoles(int descriptor, const void* bytes, std::size_t count, std::int64_t offset)
 {
     if (count < kGiB)

@@ -60,8 +60,8 @@ TEST(ChunkEdit, AnAddedChunkStandsBehindTheLast)
     }
 }
 
-/// What opening read is believed where a change since then would show, and nowhere else: here another program gave the
-/// container the size that it had before its last chunk, which leaves the file as long as it was.
+/// Values from opening are trusted only where a later change would show. Here another program has restored the
+/// container's size from before its last chunk, which keeps the file's length.
 TEST(ChunkEdit, AddingGoesByWhatOpeningReadOnlyWhereChangesShow)
 {
     static std::int64_t stamp;
@@ -313,7 +313,7 @@ TEST(ChunkEdit, OnlyAHeaderOfOursIsBuiltAnew)
         EXPECT_EQ(file.Close(), kStatusOK);
         EXPECT_EQ(readFile(folder / "a"), each.content);
     }
-    // Samples behind a header that was never filled in are counted.
+    // Samples count despite a header that was never filled in.
     const CFileRef ref((folder / "new.wav").c_str(), false);
     CAudioFileIO file;
     ASSERT_EQ(file.CreateAndOpenCommon(ref, 0, kAudioBusMono, 0, 8, 44100, kWAVE, false), kStatusOK);
@@ -347,7 +347,7 @@ TEST(ChunkEdit, TheEndIsPreparedWhereThatCostsNothing)
         return image;
     };
     const auto odd = ContainerBuilder("RIFF").format().unpadded("data", "123");
-    // Samples behind a size that was never filled in, taken for chunks.
+    // Samples after a size that was never filled in, mistaken for chunks.
     const auto open = ContainerBuilder("RIFF").format().chunk("data", "").chunk("\1\2\3\4", "5678", 0x05060708).bytes();
     const struct {
         const char* what;
@@ -406,7 +406,7 @@ TEST(ChunkEdit, TheHeaderFollowsTheSamples)
         EXPECT_EQ(file.Info().frames, 0);
         EXPECT_EQ(file.WriteFrames(samples, 0, 3), kStatusOK);
         EXPECT_EQ(add(file, "note", "x"), 1); // behind samples that the header on disk does not count yet
-        CAudioFileIO another(ref, 0);         // to which the file is whole already
+        CAudioFileIO another(ref, 0);         // another reader finds the file complete already
         EXPECT_EQ(another.Info().frames, 3);
         EXPECT_EQ(another.FindChunk(fourCC("note")), Bytes(1, std::byte{'x'}));
         EXPECT_EQ(file.Close(), kStatusOK);

@@ -1,4 +1,4 @@
-// Chunks stored for files of any kind, inside and beside them.
+// Chunks stored for any file, inside it or beside it.
 #include "audiofile/ChunkUtilities.h"
 
 #include "audiofile/CAudioFileIO.h"
@@ -29,7 +29,7 @@ CChunkData chunkOf(std::string_view body, FourCC id = kId)
     return chunk;
 }
 
-/// Written bytes are one up, read ones one down: what comes back shows that both were done.
+/// Shifts bytes up on writing and down on reading: what is read back proves both.
 void shift(void* data, long size, unsigned char reading)
 {
     for (long i = 0; i < size; ++i)
@@ -41,7 +41,7 @@ std::int32_t add(const std::string& path, std::string_view body, long flags = 0)
     return CFileUtilAddData(file(path), chunkOf(body), "ovw", flags, shift);
 }
 
-/// What is read back, or the status as text.
+/// The chunk that is read back, or the status as text.
 std::string readBack(const std::string& path, const char* extension = "ovw")
 {
     CChunkData chunk = chunkOf("before");
@@ -75,7 +75,7 @@ TEST(ChunkUtilities, OtherFilesHaveAMetadataSidecarThatIsReadWhole)
     EXPECT_EQ(add(path, "abc"), kStatusOK);
     EXPECT_EQ(bodyIn(folder / "song.ktmd"), "bcd");
     EXPECT_EQ(textOf(readFile(path)), "no container");
-    // The whole sidecar comes back, not the chunk, as it always has; and a removal leaves it alone.
+    // Kept: returns the whole sidecar instead of the chunk, and removal leaves it alone.
     const std::string whole(textOf(readFile(folder / "song.ktmd")));
     std::string expected = whole;
     shift(expected.data(), static_cast<long>(expected.size()), 1);
@@ -126,7 +126,7 @@ TEST(ChunkUtilities, TheFirstSourceWins)
     EXPECT_EQ(readBack(path), "in the file");
     folder.write("a.ovw", ContainerBuilder("RIFF").chunk("LGWV", "cftjef").bytes());
     EXPECT_EQ(readBack(path), "beside");
-    folder.write("a.ovw", "no container"); // what an add writes there is not found again
+    folder.write("a.ovw", "no container"); // an add writes there, but a read does not look there
     EXPECT_EQ(readBack(path), "in the file");
     folder.write("a.ktmd", "nfub");
     EXPECT_EQ(readBack(path), "meta");
@@ -209,11 +209,11 @@ TEST(ChunkUtilities, AFullDiskIsTold)
     {
         folder.write("a.ovw", "old");
         FaultInjector faults;
-        faults.fail(Call::pwrite, ENOSPC); // the raw sidecar's: only its creation counts, as ever
+        faults.fail(Call::pwrite, ENOSPC); // of the raw sidecar, of which only the creation counts
         EXPECT_EQ(add(path, "abc"), kStatusOK);
     }
     EXPECT_EQ(bodyIn(folder / "a.ktmd"), "bcd");
-    // A failed add inside a container is not reported, as it never was; the file stands.
+    // Kept: a failed add inside a container is not reported; the file is intact.
     const std::string inside = folder.write("a.wav", wave());
     FaultInjector faults;
     faults.fail(Call::pwrite, ENOSPC, 1, 100);

@@ -1,4 +1,4 @@
-// The walk over any source of bytes: where its two policies agree, and where they differ.
+// The walk over any source of bytes: where its two policies agree and where they differ.
 #include "media/containers/AudioDescription.h"
 
 #include "support/ContainerBuilder.h"
@@ -12,7 +12,7 @@ using namespace platform;
 
 namespace {
 
-/// Ids and sizes, then where one more chunk would stand.
+/// Ids and sizes, then the position for one more chunk.
 std::string walkOf(const MemoryBytes& file, WalkPolicy policy)
 {
     HeaderWindow window(file, file.length());

@@ -1,4 +1,4 @@
-// Recognising containers, walking them and finding chunks, in sound files and in damaged ones.
+// Recognizing containers, walking them and finding chunks, in intact and in damaged files.
 #include "audiofile/CAudioFileIO.h"
 
 #include "support/ContainerBuilder.h"

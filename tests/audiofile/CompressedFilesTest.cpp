@@ -1,4 +1,4 @@
-// Files outside the containers that are edited: compressed ones that are broken, or none at all; linear PCM.
+// Files other than editable containers: damaged compressed ones, files that are no audio, linear PCM.
 #include "audiofile/CAudioFileIO.h"
 
 #include "MemoryAudioFile.h"
@@ -65,7 +65,7 @@ TEST(CompressedFiles, LinearPCMInContainersThatAreOnlyRead)
         std::vector<float> samples(2 * frames);
         EXPECT_EQ(file.ReadFrames(samples.data(), 0, frames), kStatusOK);
         EXPECT_EQ(samples, sound.samples);
-        // Nothing makes them longer, and they have no chunks to add to.
+        // They cannot be extended, and have no place for chunks.
         EXPECT_NE(file.WriteFrames(samples.data(), frames, 10), kStatusOK);
         EXPECT_EQ(file.AddChunk(fourCC("note"), bytesOf("abcd"), false), 0);
         EXPECT_EQ(file.Close(), kStatusOK);

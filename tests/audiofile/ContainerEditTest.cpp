@@ -1,4 +1,4 @@
-// Edits of containers that are looked at before and after: what speaks against them, and that nothing else is lost.
+// Edits of containers with checks before and after: objections, and that nothing else is lost.
 #include "audiofile/CContainerEdit.h"
 #include "audiofile/ChunkSurvey.h"
 #include "audiofile/ContainerChanges.h"
@@ -33,7 +33,7 @@ std::int32_t addNote(const std::string& path)
     return AddChunkTo(at(path), {.id = kNote, .body = bytesOf("text")}).Status();
 }
 
-/// Puts other bytes into the file.
+/// Overwrites bytes in the file.
 void poke(const std::string& path, std::int64_t position, std::string_view bytes)
 {
     CFileIO file;

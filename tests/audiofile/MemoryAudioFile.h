@@ -1,4 +1,4 @@
-// Audio files made of a few bytes, opened as memory files.
+// Small audio files in memory.
 #pragma once
 
 #include "audiofile/AudioFileInfo.h"
@@ -7,7 +7,7 @@
 #include <algorithm>
 #include <memory>
 
-/// The description of a file of these bytes; `status` may be null.
+/// Describes a file with these bytes; `status` may be null.
 inline AudioFileInfo describe(BytesView content, std::int32_t* status = nullptr)
 {
     auto block = std::make_shared<KTMem>(content.size());

@@ -1,4 +1,4 @@
-// A disk that fails to read: every operation on chunks says so, and no edit takes what it cannot read for the end.
+// A disk that fails to read: every chunk operation reports it, and no edit mistakes an unreadable part for the end.
 #include "audiofile/CAudioFileIO.h"
 #include "audiofile/ChunkUtilities.h"
 
@@ -14,7 +14,7 @@
 
 namespace {
 
-/// Chunks so long that each header costs a read of its own.
+/// Chunks so long that each header takes a separate read.
 Bytes image(std::string_view container)
 {
     ContainerBuilder builder(container, container == "FORM" ? "AIFF" : "WAVE");
@@ -32,7 +32,7 @@ Bytes image(std::string_view container)
     return bytes;
 }
 
-/// The other chunks, with a hash of their bodies.
+/// All other chunks with a hash of their bodies.
 std::string withoutNotes(const Bytes& content)
 {
     MemoryAudioFile file(content, 0);
@@ -49,7 +49,7 @@ std::string withoutNotes(const Bytes& content)
 
 struct Operation {
     const char* name;
-    std::int32_t success; // what it gives when it worked
+    std::int32_t success; // result when it succeeds
     std::function<std::int32_t(CAudioFileIO&)> run;
 };
 
@@ -107,11 +107,11 @@ TEST(ReadFailure, IsToldByEveryOperationAndCostsNoChunk)
                 } else if (result == operation.success) {
                     EXPECT_EQ(now, after);
                 } else {
-                    // Kept: a CAF file whose headers cannot be read has no chunk to find.
+                    // Kept: in a CAF file with unreadable headers, no chunk is found.
                     const bool saysNothing = container == std::string_view("caff") &&
                                              operation.name == std::string_view("find") && result == 0;
                     EXPECT_TRUE(result < 0 || saysNothing) << result;
-                    // Not rolled back: a move that stopped, and a removal ahead of an addition.
+                    // Not rolled back: an interrupted move, and the removal before an addition.
                     if (now.size() != before.size()) {
                         EXPECT_EQ(withoutNotes(now), withoutNotes(before));
                     } else if (result == kStatusOK) {
@@ -134,7 +134,7 @@ TEST(ReadFailure, TheDescriptionSaysThatItIsNotAll)
     faults.fail(Call::pread, EIO, 2); // the header behind "ahea": that of the samples
     ASSERT_EQ(file.Open(ref, kFileIOReadWrite), kStatusOK);
     EXPECT_EQ(file.InfoStatus(), kStatusIOError);
-    // By a description without samples this chunk would be cut out from ahead of them.
+    // A description without samples would let this chunk be cut out from before them.
     EXPECT_EQ(file.RemoveChunk(fourCC("ahea")), kStatusIOError);
     EXPECT_EQ(file.AddChunk(fourCC("new "), bytesOf("x"), false), kStatusIOError);
     EXPECT_EQ(readFile(folder / "a.wav"), image("RIFF"));

@@ -20,7 +20,7 @@ namespace {
 constexpr long kFrames = 1001;
 constexpr int kChannels = 2;
 
-// Samples that every format holds exactly: multiples of 1/128.
+// Samples that every format can represent: multiples of 1/128.
 std::vector<float> testSamples()
 {
     std::vector<float> samples(static_cast<std::size_t>(kFrames * kChannels));
@@ -48,7 +48,7 @@ void expectTestSamples(const std::string& path)
     EXPECT_EQ(readAll(file), testSamples()) << path;
 }
 
-/// The test samples as they are, for programs that make files of them; false when one of the programs is not there.
+/// Writes the raw test samples for other programs; false if one of the programs is missing.
 bool writeRaw(const TemporaryFolder& folder, const char* programs)
 {
     const std::vector<float> samples = testSamples();
@@ -88,7 +88,7 @@ std::int32_t createStereo(CAudioFileIO& file, const std::string& path, FourCC ty
     return file.CreateAndOpenCommon(ref, 0, kAudioBusStereo, 0, bits, 44100, type, option);
 }
 
-// Creates a file of the test samples, written in two pieces.
+// Creates a file of the test samples in two writes.
 void create(const std::string& path, FourCC type, int bits, bool option)
 {
     const std::vector<float> samples = testSamples();
@@ -144,7 +144,7 @@ TEST(SampleAccess, DeliversWhatIsThere)
     EXPECT_EQ(got[5], testSamples().back());
     EXPECT_EQ(got[6], 9.0F);
     EXPECT_EQ(file.ReadFrames(got.data(), -1, 1), kStatusParameterError);
-    // Cut after it was opened: whole frames, and an error.
+    // If the file is cut after opening: whole frames, and an error.
     std::filesystem::resize_file(ref.GetPath(), static_cast<std::uintmax_t>(file.Info().dataOffset) + 6 * 4 + 5);
     long delivered = -1;
     EXPECT_EQ(file.ReadFrames(got.data(), 0, 10, &delivered), kStatusEndOfFile);
@@ -155,7 +155,7 @@ TEST(SampleAccess, OverwritesButNeverGrowsIntoWhatIsNotItsOwn)
 {
     const TemporaryFolder folder;
     const std::vector<float> samples(100, 0.5F);
-    // Frames are overwritten in any file; a header with chunks of others is not built anew.
+    // Frames can be overwritten in any file; a header with foreign chunks is not rebuilt.
     for (const char* name :
          {"surround-24.wav", "kick-24-rf64.wav", "tone-16.aiff", "tone-sowt.aifc", "bell-16-be.caf"}) {
         Bytes expected = readFile(mediaPath(name));
@@ -180,7 +180,7 @@ TEST(SampleAccess, OverwritesButNeverGrowsIntoWhatIsNotItsOwn)
                     expected.begin() + static_cast<std::ptrdiff_t>(at));
         EXPECT_EQ(after, expected) << name;
     }
-    // A chunk behind the samples stays whole.
+    // A chunk after the samples stays intact.
     create(folder / "own.wav", kWAVE, 16, false);
     CAudioFileIO file(CFileRef((folder / "own.wav").c_str(), false), kFileIOReadWrite);
     ASSERT_EQ(file.AddChunk(fourCC("note"), bytesOf("hello!"), false), 1);

@@ -1,4 +1,4 @@
-// Audio files as libsndfile writes and reads them.
+// Audio files written and read with libsndfile.
 #pragma once
 
 #include <sndfile.h>
@@ -20,7 +20,7 @@ struct Sound {
     std::vector<float> samples; // interleaved
 };
 
-/// What libsndfile reads of a file.
+/// Reads a file with libsndfile.
 inline Sound readSound(const std::string& path)
 {
     Sound sound;
@@ -34,7 +34,7 @@ inline Sound readSound(const std::string& path)
     return sound;
 }
 
-/// Samples of full scale, no two alike next to each other.
+/// Full-scale samples without equal neighbours.
 inline std::vector<float> testWave(std::size_t count)
 {
     std::vector<float> samples(count);
@@ -43,7 +43,7 @@ inline std::vector<float> testWave(std::size_t count)
     return samples;
 }
 
-/// Lets libsndfile write a file of `frames` frames.
+/// Writes a file of `frames` frames with libsndfile.
 inline void writeSound(const std::string& path, int format, int channels, int frames)
 {
     SF_INFO info{};
@@ -56,7 +56,7 @@ inline void writeSound(const std::string& path, int format, int channels, int fr
     ASSERT_EQ(sf_writef_float(file.get(), samples.data(), frames), frames);
 }
 
-/// Every kind of linear PCM that the library is to read.
+/// All kinds of linear PCM that the library must read.
 inline constexpr int kSoundFormats[] = {SF_FORMAT_WAV | SF_FORMAT_PCM_U8,
                                         SF_FORMAT_WAV | SF_FORMAT_PCM_16,
                                         SF_FORMAT_WAV | SF_FORMAT_PCM_24,

@@ -1,5 +1,5 @@
-// The stream interface: what libsndfile wrote, read from any place; the checks on opening; the properties; the
-// registry. The same header is taken by a C compiler in c/StreamClient.c.
+// The stream interface: files of libsndfile read from any position; checks on opening; properties; the registry.
+// c/StreamClient.c compiles the same header as C.
 #include "audiofile/XStream.h"
 
 #include "AllocationCount.h"
@@ -26,7 +26,7 @@ XStreamDescription floats(std::uint32_t channels)
     return {44100, fourCC("lpcm"), flags, 4 * channels, 1, 4 * channels, channels, 32, 0};
 }
 
-/// A stream that is closed at the end.
+/// A stream that is closed on destruction.
 struct Stream {
     XStreamRef handle = nullptr;
     std::int32_t status;
@@ -40,7 +40,7 @@ struct Stream {
     Stream& operator=(const Stream&) = delete;
 };
 
-/// The file that the stream has open.
+/// The file that the stream has opened.
 XStreamFileRef lentBy(const Stream& stream)
 {
     platform::AudioHandle* file = nullptr;
@@ -346,7 +346,7 @@ TEST(XStream, PropertiesOfTheReaderComeFirstThenThoseOfItsFile)
     const XStreamDescription client = floats(1);
     EXPECT_EQ(XStreamSetProperty(stream.handle, fourCC("cfmt"), 40, &client), 0);
     EXPECT_EQ(XStreamSetProperty(stream.handle, fourCC("cfmt"), 36, &client), 0x2173697A);
-    // The service of files is handed the stream, which is none of its own.
+    // The file service receives the stream, which does not belong to it.
     EXPECT_EQ(XStreamSetProperty(stream.handle, fourCC("pcnt"), 8, &packets), kStatusParameterError);
     std::uint32_t isWritable = 1;
     EXPECT_EQ(XStreamGetPropertyInfo(stream.handle, fourCC("pcnt"), &size, &isWritable), kStatusParameterError);

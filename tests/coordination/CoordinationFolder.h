@@ -1,4 +1,4 @@
-// A test with a coordination folder of its own, shared with the agents that it starts.
+// A test with its own coordination folder, which its agents share.
 #pragma once
 
 #include "platform/FileCoordination.h"

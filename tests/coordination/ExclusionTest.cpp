@@ -11,7 +11,7 @@ class ExclusionTest : public CoordinationFolder {};
 constexpr const char* kKinds[] = {"read",        "write",      "presenterlock 0", "presenterlock 1", "presenterlock 2",
                                   "coordlock 0", "coordlock 1"};
 
-/// By the kinds, who waits for whom: a line for each holder, a column for each comer. Acquiring a presenter lock is a
+/// Who waits for whom, by kind: a row for each holder, a column for each newcomer. Acquiring a presenter lock is a
 /// coordinated write.
 constexpr const char* kWaits[] = {
     ". w w w w . w", // read
@@ -48,7 +48,7 @@ TEST_F(ExclusionTest, TheTableOfTypesHoldsBetweenProcesses)
         }
 }
 
-// Each kind of presence has a byte of its own, and a process may have raised several.
+// Each kind of presence has its own byte, and a process may raise several.
 TEST_F(ExclusionTest, OfTwoPresenterLocksOfAProcessEachHoldsItsOwnKindsBack)
 {
     for (const char* second : {"presenterlock 0", "presenterlock 2"}) {

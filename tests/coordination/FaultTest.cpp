@@ -1,5 +1,4 @@
-// Faults around the service: presenters that misbehave, stopped and forked processes, a bad folder, a system that
-// refuses.
+// Faults around the service: misbehaving presenters, stopped and forked processes, a bad folder, a failing system.
 #include "AgentProcess.h"
 #include "CoordinationFolder.h"
 
@@ -32,7 +31,7 @@ namespace {
 
 class FaultTest : public CoordinationFolder {
 protected:
-    /// The system error with which a write fails, 0 when it does not.
+    /// The error with which a write fails; 0 if it succeeds.
     int errorOfWrite(const std::string& path)
     {
         Error error;
@@ -46,8 +45,8 @@ protected:
 
 struct Misbehaviour {
     const char* behaviour;
-    const char* release; // what lets the writer through when it does not come by itself
-    const char* sign;    // what is said before
+    const char* release; // what lets the writer through if nothing else does
+    const char* sign;    // what is reported before
 };
 
 std::size_t openDescriptors()
@@ -119,7 +118,7 @@ TEST_F(FaultTest, AStoppedProcessThatHoldsNothingStopsNobody)
     ASSERT_TRUE(stopped.expect("p releases"));
     stopped.tell("p state");
     ASSERT_TRUE(stopped.expect("p count 0"));
-    ASSERT_EQ(errorOfWrite(), 0); // the accessor in which the lock was acquired has ended too
+    ASSERT_EQ(errorOfWrite(), 0); // the accessor that acquired the lock has ended too
     stopped.signal(SIGSTOP);
     EXPECT_TRUE(writer.beginsAndGets("w", "write", item()));
 }
@@ -154,7 +153,7 @@ TEST_F(FaultTest, InterruptingSignalsDoNotShow)
     reader.begin("r", "read", item());
     holder.end("h");
     writer.end("w");
-    reader.end("r"); // it may have passed the writer while that was asking
+    reader.end("r"); // it may have overtaken the writer meanwhile
     EXPECT_TRUE(writer.expect("w out"));
     EXPECT_TRUE(reader.expect("r out"));
 }
@@ -199,7 +198,7 @@ TEST_F(FaultTest, WithoutMemoryForLocksTheErrorSaysSoAndNothingIsHeld)
         isDone = left >= 0;
         lockCall() = real;
         EXPECT_EQ(error, isDone || error == 0 ? 0 : ENOLCK);
-        EXPECT_EQ(errorOfWrite(), 0); // waits forever when something was left
+        EXPECT_EQ(errorOfWrite(), 0); // hangs if something was left behind
     }
 }
 
@@ -257,7 +256,7 @@ TEST_F(FaultTest, ADeletedFolderIsMadeAgainAndWaitersFindEachOtherThere)
     ASSERT_TRUE(awaitWaiting(late, item(), true));
     waiter.end("w");
     ASSERT_TRUE(late.gets("l"));
-    // A presenter that notices takes what it holds along.
+    // A presenter that notices moves what it holds.
     ASSERT_TRUE(presenter.beginsAndGets("q", "presenterlock 0", item("more")));
     late.begin("m", "write", item("presented"));
     ASSERT_TRUE(awaitWaiting(late, item("presented"), true));
@@ -313,7 +312,7 @@ TEST_F(FaultTest, WhoWaitsStandsBehindTheLastTicketWhateverGapsTheKilledLeft)
         }
 }
 
-// Whoever is present and has nothing to be asked through has just ended, or begun: its slot is for others then.
+// A process that is present but cannot be asked has just ended or begun; its slot may pass to others.
 TEST_F(FaultTest, ThePresenceOfOneWhoCannotBeAskedIsWaitedForAndLeftAlone)
 {
     const ItemWindow window(CoordinatedItem(itemURL()).key());
@@ -358,7 +357,7 @@ TEST_F(FaultTest, AFileMayBeCreatedReplacedAndRenamedWhileItIsLocked)
 TEST_F(FaultTest, DescriptorsThreadsAndTheFolderReturnToTheirLevel)
 {
     constexpr std::size_t kMany = 500, kPool = 32;
-    std::thread([] {}).join(); // a sanitizer begins a thread of its own with the first
+    std::thread([] {}).join(); // a sanitizer starts a thread of its own with the first one
     const auto before = std::pair(openDescriptors(), threads());
     std::vector<std::shared_ptr<KTFilePresenterLock>> held;
     std::latch called(kMany);
@@ -385,7 +384,7 @@ TEST_F(FaultTest, DescriptorsThreadsAndTheFolderReturnToTheirLevel)
         thread.join();
     EXPECT_EQ(entered, kMany);
     held.clear();
-    while (threads() > before.second) // those that wait for more work end by themselves
+    while (threads() > before.second) // idle threads end by themselves
         std::this_thread::yield();
     EXPECT_LE(openDescriptors(), before.first + kPool);
     for (const auto& entry : fs::directory_iterator(folder()))

@@ -1,5 +1,5 @@
-// Processes that are killed, at moments of our choice and at random ones. KTFILES_KILLS is how many are killed at
-// random; the targeted kills are a fifth of that.
+// Processes killed at chosen and at random moments. KTFILES_KILLS is the number of random kills; targeted kills are a
+// fifth of that.
 #include "AgentProcess.h"
 #include "CoordinationFolder.h"
 
@@ -34,10 +34,10 @@ void expectNoViolation(const AgentProcess& agent)
 
 struct Victim {
     const char* name;
-    const char* held;  // by a first process
-    const char* asks;  // what a second one asks for, and waits
-    bool killsHolder;  // else the one that asks
-    const char* third; // what a third asks for behind it
+    const char* held;  // what the first process holds
+    const char* asks;  // what the second process asks for in vain
+    bool killsHolder;  // otherwise the one that asks
+    const char* third; // what a third process asks for behind it
 };
 
 constexpr Victim kVictims[] = {
@@ -69,7 +69,7 @@ TEST_F(KillTest, WhoeverIsKilledLeavesNobodyStuck)
             if (victim.killsHolder) {
                 first.kill();
                 second.end("b");
-                third.end("c"); // either may be the first
+                third.end("c"); // either may come first
                 ASSERT_TRUE(second.expect("b out"));
             } else {
                 second.kill();
@@ -101,7 +101,7 @@ TEST_F(KillTest, ChurnUnderRandomKillsLeavesNothingViolatedAndNobodyStuck)
         for (auto& agent : agents)
             agent->read(0);
     }
-    for (auto& agent : agents) { // they still get somewhere
+    for (auto& agent : agents) { // they still make progress
         agent->clearLines();
         ASSERT_FALSE(agent->expectStart("steps").empty());
     }

@@ -1,4 +1,4 @@
-// The counting of both lock classes, within one process: handlers, cancellation, races.
+// Counting in both lock classes within one process: handlers, cancellation, races.
 #include "CoordinationFolder.h"
 
 #include "coordination/KTFileCoordinationLock.h"
@@ -20,7 +20,7 @@ using namespace platform;
 
 namespace {
 
-/// Waits for it; it lasts until it is dropped.
+/// Waits for access, which lasts until it is dropped.
 std::unique_ptr<CoordinatedAccess> openForWriting(const URLRef& url)
 {
     return FileCoordinator().openForWriting(url, FileCoordinator::WritingOptions::none);
@@ -55,7 +55,7 @@ private:
     std::string text_;
 };
 
-/// Returns once everything that was acquired on the item before has been let go of.
+/// Returns once everything acquired on the item before is released.
 void awaitFree(const URLRef& url)
 {
     EXPECT_TRUE(openForWriting(url));
@@ -70,7 +70,7 @@ std::shared_ptr<Lock> makeLock(const URLRef& url)
         return Lock::initLockForWritingAtURL(url);
 }
 
-/// Until a handler is called on this thread: those of the acquisition have all returned.
+/// Waits for a handler to be called on this thread, after which all acquisition handlers have returned.
 template <class Lock>
 void retainUntilCalledAtOnce(Lock& lock)
 {
@@ -97,7 +97,7 @@ TYPED_TEST_SUITE(LockCountTest, LockClasses);
 TYPED_TEST(LockCountTest, AReleaseDuringTheAcquisitionTakesALaterHolderOrCancels)
 {
     struct {
-        const char* steps; // + retains, - releases, in the acquisition
+        const char* steps; // + retains, - releases, during the acquisition
         std::int64_t count;
     } const cases[] = {{"+", 1},    {"+-", 0},   {"++-", 1},  {"++--", 0},  {"+-+", 1},
                        {"+--+", 1}, {"+-++", 2}, {"+-+-", 0}, {"+++--", 1}, {"-+", 1}};
@@ -116,7 +116,7 @@ TYPED_TEST(LockCountTest, AReleaseDuringTheAcquisitionTakesALaterHolderOrCancels
                     fresh->releaseLock();
                 }
         }
-        called.await(retains); // every handler is called, also those of holders that have left
+        called.await(retains); // all handlers are called, also those of holders that left
         if (one.count == 0)
             awaitFree(this->itemURL());
         EXPECT_EQ(fresh->lockCount(), one.count);
@@ -168,7 +168,7 @@ TYPED_TEST(LockCountTest, AnAcquisitionThatFailsCallsNobodyAndLeavesTheLockIdle)
 
 namespace {
 
-/// Descriptors of this process that are sockets: others find its presenters by one.
+/// Number of this process's sockets, through which others find its presenters.
 std::ptrdiff_t sockets()
 {
     std::error_code error;
@@ -205,19 +205,19 @@ TYPED_TEST(LockCountTest, TheTableKnowsALockUntilItIsRemoved)
               std::string::npos);
     retainUntilCalledAtOnce(*kept);
     const std::int64_t count = kept->lockCount();
-    // What a host's handler throws comes back to the host, and costs the table nothing.
+    // An exception of a host's handler reaches the host and leaves the table intact.
     EXPECT_THROW(retainByURL<TypeParam>(this->itemURL(), [] { throw 1; }), int);
     EXPECT_EQ(kept->lockCount(), count + 1);
     kept->resetLock();
     awaitFree(this->itemURL());
     TypeParam::removeLockForURL(this->itemURL());
     EXPECT_FALSE(TypeParam::lockForURL(this->itemURL()));
-    EXPECT_LE(sockets(), before); // it is presented no more, though somebody has it
+    EXPECT_LE(sockets(), before); // no longer presented, although somebody holds it
 }
 
 TEST_F(PresenterLockTest, OfTwoLocksOfOneFileOneAtATimeIsHeld)
 {
-    // Both are seen as being acquired by the time that one comes to be held.
+    // Both are visible as being acquired by the time one is held.
     const auto make = [&] {
         return KTFilePresenterLock::initLockWithType(KTFilePresenterLock::LockType::readersAndWriters, itemURL());
     };
@@ -238,7 +238,7 @@ TEST_F(PresenterLockTest, OfTwoLocksOfOneFileOneAtATimeIsHeld)
     }
 }
 
-/// What thread sanitizer is to look at: all operations at once, and a count that comes out even.
+/// For thread sanitizer: all operations at once, with a count that must balance.
 TYPED_TEST(LockCountTest, RacesOfRetainReleaseResetEndIdle)
 {
     constexpr int kRounds = 300;
@@ -262,7 +262,7 @@ TYPED_TEST(LockCountTest, RacesOfRetainReleaseResetEndIdle)
         });
     for (std::thread& thread : threads)
         thread.join();
-    // An acquisition may be under way, and resets may have taken holders before their release.
+    // An acquisition may be in progress, and resets may have removed holders before their release.
     while (this->lock->isInUse())
         this->lock->resetLock();
     while (const auto table = KTFilePresenterLock::lockForURL(this->itemURL())) {
@@ -270,7 +270,7 @@ TYPED_TEST(LockCountTest, RacesOfRetainReleaseResetEndIdle)
         KTFilePresenterLock::removeUnusedLocks();
     }
     awaitFree(this->itemURL());
-    // An acquisition whose holders were reset calls their handlers all the same.
+    // An acquisition whose holders were reset still calls their handlers.
     for (int i = 0; i < 60'000 && called < 4 * kRounds; ++i)
         std::this_thread::sleep_for(std::chrono::milliseconds(1));
     EXPECT_EQ(called, 4 * kRounds); // every handler once

@@ -9,7 +9,7 @@ namespace {
 
 constexpr std::size_t kSize = 2048;
 
-/// A C string of some capacity, with bytes around it that nobody may touch.
+/// A C string of a given capacity, surrounded by bytes that must not change.
 class Name {
 public:
     explicit Name(std::string_view text, std::size_t capacity = kSize) : capacity_(capacity)
@@ -40,7 +40,7 @@ TEST(StereoNames, TheSuffixIsFoundAndCut)
     struct Case {
         const char* name;
         int flags, result;
-        const char* left; // what is left of the name
+        const char* left; // the remaining name
     };
     const Case cases[] = {
         {"Bass.R.AIF", 0, 1, "Bass.R.AIF"},
@@ -106,7 +106,7 @@ TEST(KnownExtensions, AreCutUntilNoneIsLeft)
     EXPECT_FALSE(CFileUtilCutKnownAudioFileExtension(&none));
     EXPECT_FALSE(CFileUtilHasKnownAudioFileExtension(none));
 
-    // With a base it is the name that is cut, and what comes of it stands alone.
+    // With a base, only the name is cut, and the result has no base.
     const platform::URLRef base = platform::URL::createWithString("file:///base/");
     CFileRef based(platform::URL::createWithString("Loop.wav", base));
     EXPECT_TRUE(CFileUtilCutKnownAudioFileExtension(&based));
@@ -121,7 +121,7 @@ TEST(Extensions, AreEnsuredSetAndAppended)
         const char *name, *extension;
         int capacity;
         const char* result;
-        bool changes = true; // what ensuring returns
+        bool changes = true; // result of ensuring
     };
     const Case cases[] = {
         {Do::ensure, "song.AIF", "aif", 64, "song.AIF", false},

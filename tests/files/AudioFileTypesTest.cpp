@@ -29,7 +29,7 @@ TEST(AudioFileTypes, TheTableIsInItsOrder)
 
 TEST(AudioFileTypes, OfExtensions)
 {
-    // The whole table, in its order, as written by hand from the list that hosts know.
+    // The whole table in order, written by hand from the list that hosts know.
     constexpr std::string_view expected =
         "aiff=AIFF aif=AIFF ail=AIFF air=AIFF aifc=AIFF wave=WAVE wav=WAVE war=WAVE wal=WAVE caf=caff aac=adts au=NeXT "
         "snd=NeXT ac3=ac-3 rex=REX  rx2=REX2 rcy=RCSO mp3=MPG3 mp4=mpg4 m4v=mpg4 m4a=M4A  adts=adts mov=MooV dv=MooV "

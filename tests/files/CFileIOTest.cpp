@@ -29,7 +29,7 @@ namespace {
 constexpr long long kHuge = std::numeric_limits<long long>::max();
 constexpr std::size_t kMiB = 1048576;
 
-/// Bytes of which no two windows look alike.
+/// Bytes in which all windows differ.
 Bytes pattern(std::size_t size)
 {
     std::minstd_rand random(1);
@@ -98,7 +98,7 @@ TEST_F(CFileIOTest, OpenRefusesWhatIsNoFile)
     close(after);
 }
 
-// Every way through the cache delivers what a plain read delivers, status and count included.
+// Every path through the cache delivers the same as a plain read, including status and count.
 TEST_F(CFileIOTest, CachedReadsEqualPlainReads)
 {
     const CFileRef file = fileOf(pattern(1000));
@@ -141,7 +141,7 @@ TEST_F(CFileIOTest, ReadFailuresAreLoggedAndTellWhatWasDelivered)
     EXPECT_EQ(io.Read(buffer, 0, -1, &actual), kStatusParameterError);
     EXPECT_EQ(io.Read(buffer, kHuge, 3, &actual), kStatusParameterError);
     EXPECT_EQ(actual, 0);
-    // Damage behind what was asked for must not fail the request.
+    // Damage after the requested bytes must not fail the request.
     io.SetCache(100);
     faults.fail(Call::pread, EIO, 2);
     EXPECT_EQ(io.Read(buffer, 0, 40, &actual), kStatusOK);
@@ -250,7 +250,7 @@ TEST_F(CFileIOTest, BlockMoveKeepsTheTail)
             Bytes found(c.size + c.to - c.from);
             ASSERT_EQ(io.GetEOF(), static_cast<long long>(found.size()));
             ASSERT_EQ(io.Read(found.data(), 0, static_cast<long>(found.size()), nullptr), kStatusOK);
-            // The old bytes between the two places may be anything.
+            // Old bytes between the two positions may become anything.
             const auto kept = static_cast<std::ptrdiff_t>(std::min(c.from, c.to));
             EXPECT_TRUE(std::equal(found.begin(), found.begin() + kept, expected.begin()));
             const auto moved = static_cast<std::ptrdiff_t>(c.size - c.from);
@@ -342,7 +342,7 @@ TEST_F(CFileIOTest, ARequestBeyondTheCacheLeavesItAsItIs)
 TEST_F(CFileIOTest, MemoryFilesGrowByTheirMarkAndTakeABlockForContent)
 {
     CFileIO io(CFileRef::None, 0x8001);
-    // Growing sets the length, which brings a mark beyond it back.
+    // Growing sets the length, which moves a mark beyond it back.
     io.SetMark(100);
     EXPECT_EQ(io.Write("x", 10, 1), kStatusOK);
     EXPECT_EQ(io.GetEOF(), 11);
@@ -399,7 +399,7 @@ TEST_F(CFileIOTest, AllocatingKeepsNoSpaceBehindTheEnd)
     EXPECT_LE(static_cast<std::size_t>(status.st_blocks) * 512, 3 * kMiB + 65536);
 }
 
-// Opened at once or step by step, the base holds the path of the file itself.
+// Whether opened at once or step by step, the base holds the path of the file itself.
 TEST_F(CFileIOTest, DotsInAPathAreResolved)
 {
     fs::create_directories(folder / "sub/.hidden");
@@ -417,7 +417,7 @@ TEST_F(CFileIOTest, DotsInAPathAreResolved)
     }
 }
 
-// A file server holds leases on what its clients use. Who opens such a file waits until the lease is given back.
+// File servers hold leases on files in use. Opening such a file waits until the lease is returned.
 TEST_F(CFileIOTest, AFileUnderALeaseIsWaitedFor)
 {
     const CFileRef file = fileOf(pattern(10));
@@ -448,7 +448,7 @@ TEST_F(CFileIOTest, AFileUnderALeaseIsWaitedFor)
     std::signal(SIGIO, before);
 }
 
-// To open a FIFO lets go whoever waits to write into it; the close that follows would kill that process.
+// Opening a FIFO releases a waiting writer, which the following close would kill.
 TEST_F(CFileIOTest, TheWriterOfAFIFOIsLeftWaiting)
 {
     const std::string path = folder / "fifo.mp3";
@@ -460,7 +460,7 @@ TEST_F(CFileIOTest, TheWriterOfAFIFOIsLeftWaiting)
         close(open(path.c_str(), O_WRONLY | O_CLOEXEC));
         isOpen = true;
     });
-    const auto waits = [&task] { // its state, behind its name: asleep
+    const auto waits = [&task] { // state "asleep" after the name
         std::string stat;
         std::getline(std::ifstream("/proc/self/task/" + std::to_string(task) + "/stat"), stat);
         return stat.find(") S ") != stat.npos;

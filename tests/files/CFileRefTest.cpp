@@ -17,7 +17,7 @@ using platform::String;
 
 namespace {
 
-/// The path with a slash at the end when the reference denotes a directory; empty when there is none.
+/// The path, with a trailing slash for a directory; empty if there is none.
 std::string shown(const CFileRef& ref)
 {
     const std::string path(ref);
@@ -91,7 +91,7 @@ TEST(CFileRef, PathsAreAsTheyWereSet)
     EXPECT_STREQ(directory("/").GetPath(), "/");
     EXPECT_STREQ(file("/" + std::string(3000, 'x')).GetPath(), ("/" + std::string(3000, 'x')).c_str());
 
-    // Kept: the colon style is answered in the Windows form.
+    // Kept: a request for the colon style returns the Windows form.
     EXPECT_EQ(file("/a").CopyFileSystemPath(kPOSIXPathStyle).utf8(), "/a");
     EXPECT_EQ(file("/a").CopyFileSystemPath(kColonPathStyle), file("/a").CopyFileSystemPath(kWindowsPathStyle));
 
@@ -102,13 +102,13 @@ TEST(CFileRef, PathsAreAsTheyWereSet)
     EXPECT_STREQ(buffer, "");
 }
 
-// Text that is not UTF-8, of an odd number of bytes, falls through to an encoding of two bytes each: one zero ends it.
+// Text of odd length that is not UTF-8 falls through to a two-byte encoding, where a single zero ends it.
 TEST(CFileRef, ColonPathsAreNotReadBeyondTheirZero)
 {
     CFileRef::mLocalEncoding = platform::kTextEncodingUTF8;
     for (const std::string_view path : {"Disk:\xFF\xFE", "\xFF", "Disk:a\xC3"})
         for (const bool isDirectory : {false, true}) {
-            // On the heap, and no byte longer, so that a sanitizer sees what is read behind it.
+            // On the heap without spare bytes, so that a sanitizer detects reads beyond it.
             const std::unique_ptr<char[]> exact(new char[path.size() + 1]);
             *std::copy(path.begin(), path.end(), exact.get()) = '\0';
             std::string behind(path);
@@ -152,7 +152,7 @@ TEST(CFileRef, ExtensionsFollowTheLastDot)
     }
 }
 
-// What the operation calls done is there to be asked for, up to the longest name that a reference gives.
+// An operation that succeeded has a result, up to the longest name that a reference accepts.
 TEST(CFileRef, ReplacedExtensionsFitTheName)
 {
     for (const std::size_t length : {1019U, 1020U, 1023U}) {
@@ -172,7 +172,7 @@ TEST(CFileRef, TheLastComponentOfAnotherIsAdded)
     EXPECT_EQ(shown(ref), "/Music/Loops/one.wav");
 }
 
-// On an overlay a file has another device than its folder, though nothing is mounted on it.
+// On an overlay a file and its folder have different devices, although nothing is mounted on the file.
 TEST(CFileRef, TheFilesOfAnOverlayAreNoRoots)
 {
     const TemporaryFolder folder;
@@ -213,7 +213,7 @@ TEST(CFileRef, QueriesAskTheFileSystem)
     EXPECT_TRUE(plain.GetMountPoint().IsRoot());
     EXPECT_FALSE(file("/no/such/item").GetMountPoint().IsValid());
 
-    // A root whose status is not to be had must not be looked for for ever.
+    // If the root's status cannot be read, the search must not loop for ever.
     SystemCallGuard guard;
     static int calls;
     calls = 0;
@@ -303,7 +303,7 @@ TEST(CFileRef, PropertyListsHoldBookmarkAndURL)
     EXPECT_TRUE(xml && ref.SetFromBinaryPList(*xml, true));
     EXPECT_EQ(ref, original);
 
-    // Renamed: found. Gone: where it was. No bookmark that can be read: the URL.
+    // Renamed: found. Gone: its former path. An unreadable bookmark: the URL.
     fs::rename(folder / "a b.wav", folder / "c.wav");
     EXPECT_TRUE(ref.SetFromBinaryPList(*binary, false));
     EXPECT_EQ(shown(ref), folder / "c.wav");

@@ -12,7 +12,7 @@
 
 namespace {
 
-/// The local time zone, until it goes out of scope.
+/// Sets the local time zone until the end of the scope.
 class TimeZone {
 public:
     explicit TimeZone(const char* zone)
@@ -52,7 +52,7 @@ TEST(Dates, TheModificationDateBothWays)
         EXPECT_EQ(CFileUtilUTCModDate(file), seconds);
         EXPECT_EQ(CFileUtilGetModificationDate(file), platform::Date{seconds});
     }
-    // The command "stat" is another reader: ten seconds into 2001.
+    // The command "stat" as an independent reader: ten seconds into 2001.
     ASSERT_EQ(CFileUtilSetModificationDate(file, {10}), 0);
     EXPECT_EQ(platform::fileDate(path.c_str(), platform::FileDate::modification), (platform::FileTime{978'307'210, 0}));
     for (const double none : {std::nan(""), std::numeric_limits<double>::infinity(), 1e300, -1e300})
@@ -63,7 +63,7 @@ TEST(Dates, TheModificationDateBothWays)
     EXPECT_EQ(CFileUtilUTCModDate(CFileRef((folder / "link").c_str(), false)), 10);
 }
 
-// To the nanosecond, as far as a number holds it: what was read and set again is the same.
+// As exact as a double allows: reading and setting a date does not change it.
 TEST(Dates, WhatWasReadIsSetAgain)
 {
     const TemporaryFolder folder;
@@ -124,7 +124,7 @@ TEST(Dates, TheLocalOffsetKnowsDaylightSaving)
     EXPECT_EQ(platform::localOffsetFromUTC(change - 1), 3600);
     EXPECT_EQ(platform::localOffsetFromUTC(change), 7200);
 
-    // The date of a file from the other half of the year is shifted by the offset of today all the same.
+    // The date of a file from the other half of the year is still shifted by today's offset.
     const TemporaryFolder folder;
     const CFileRef file(folder.write("file", "x").c_str(), false);
     const std::int64_t today = platform::localOffsetFromUTC(platform::currentTime());

@@ -20,7 +20,7 @@ namespace fs = std::filesystem;
 
 namespace {
 
-/// The desktop's folders below a folder of the test.
+/// The desktop's folders inside a folder of the test.
 class PlacesBelow {
 public:
     explicit PlacesBelow(const TemporaryFolder& folder) : before_(platform::places())
@@ -96,7 +96,7 @@ TEST(Volumes, NetworkFileSystemsGoByTheirNames)
     EXPECT_FALSE(CFileUtilIsReadOnlyVolume(CFileRef::None));
 }
 
-// In a mount table of its own, which takes a process of its own.
+// Uses its own mount table, which requires a separate process.
 TEST(Volumes, MountsAreTakenForWhatTheyAre)
 {
     struct statx root {};
@@ -203,7 +203,7 @@ TEST(Locations, LibrariesCloudAndApplication)
     EXPECT_FALSE(CFileUtilIsInLibraryFolder(file(folder / "any/Library.bundle/missing.wav")));
     fs::create_symlink(folder / "any/Library.bundle/missing.wav", folder / "any/Library.bundle/dangling");
     EXPECT_FALSE(CFileUtilIsInLibraryFolder(file(folder / "any/Library.bundle/dangling")));
-    // A program outside an application has its own folder for one.
+    // A program outside an application bundle has its folder to itself.
     platform::places().executable = folder / "any/tool";
     EXPECT_TRUE(CFileUtilIsInAppBundle(file(folder / "any/x")));
     EXPECT_FALSE(CFileUtilIsInAppBundle(file(folder / "x")));

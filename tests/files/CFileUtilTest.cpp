@@ -1,4 +1,4 @@
-// Deleting, sizes, and names that are free.
+// Deleting, sizes, and unused names.
 #include "files/CFileUtil.h"
 #include "files/CFileUtilUniqueName.h"
 #include "platform/core/Status.h"

@@ -1,4 +1,4 @@
-// Safe edits: the old file or the new one, with all that belongs to it, and nothing beside it.
+// Safe edits: the old file or the new one with everything that belongs to it, and nothing left beside it.
 #include "files/CSafeEdit.h"
 #include "files/CTemporaryFile.h"
 #include "platform/FileLock.h"
@@ -192,7 +192,7 @@ TEST_F(SafeEdit, BackupsAreNeverOverwritten)
     }
     EXPECT_EQ(textIn(path + ".bak"), kOld);
     EXPECT_EQ(textIn(path + ".bak.1"), kNew);
-    // What an edit leaves that is killed between its backup and its end.
+    // The state after an edit that was killed between its backup and its end.
     fs::create_hard_link(path, path + ".bak.2");
     EXPECT_EQ(edit(path, writeNew, {.inPlace = true}).kind, Kind::sameAsBackup);
     EXPECT_FALSE(edit(path, [](const std::string&) { return kStatusOK; }, {.backup = true}));
@@ -257,7 +257,7 @@ TEST_F(SafeEdit, EditsWaitForEachOther)
         edit(path, writeNew, {.waitForLock = [](int, const std::string&) { return kStatusFileBusy; }});
     EXPECT_EQ(problem.kind, Kind::refused);
     EXPECT_EQ(problem.Status(), kStatusFileBusy);
-    // The file that the first edit put in its place is the one that the second changes.
+    // The second edit changes the file that the first one has put in place.
     const auto wait = [&](int, const std::string&) {
         EXPECT_FALSE(first.Apply([&](const std::string& copy) { return writeNew(copy); }));
         return kStatusOK;

@@ -1,4 +1,4 @@
-// Loop files for the tests of the chunks manager, and what is in them as plain texts.
+// Loop files for tests of the chunks manager, and their content as plain text.
 #pragma once
 
 #include "loops/VireoLoopChunksManager.h"
@@ -17,7 +17,7 @@ inline VireoLoopChunksManager manage(const std::string& path, bool forWriting = 
                                   forWriting ? AudioFile::Permission::readWrite : AudioFile::Permission::read);
 }
 
-/// An audio file without tags, with these chunks behind or ahead of its samples.
+/// An audio file without tags, with these chunks after or before its samples.
 inline Bytes audioFile(FourCC container, const Chunks& others = {}, bool isAhead = false)
 {
     Chunks chunks{formatChunk(container), dataChunk(container)};
@@ -25,7 +25,7 @@ inline Bytes audioFile(FourCC container, const Chunks& others = {}, bool isAhead
     return buildContainer(container, chunks);
 }
 
-/// The samples of a file, which must open.
+/// The samples of a file, which must be readable.
 inline std::string samplesOf(const std::string& path)
 {
     const auto file = openAudio(path, false);
@@ -36,7 +36,7 @@ inline std::string samplesOf(const std::string& path)
     return samples.substr(0, count);
 }
 
-/// Tag by tag: "BeatCount", "Title", "transients", "CHST", "silence".
+/// One entry per tag: "BeatCount", "Title", "transients", "CHST", "silence".
 using Tags = std::map<std::string, std::string>;
 
 inline std::string inWords(const platform::Value& value)
@@ -85,7 +85,7 @@ inline Tags tagsOf(const std::string& path)
     return tagsIn(list);
 }
 
-/// Every kind of chunk with something in it that both containers can hold; `length` makes their lengths differ.
+/// Every kind of chunk, with content that both containers can hold; `length` varies its length.
 inline VireoLoopChunkList everyKind(std::size_t length)
 {
     VireoLoopChunkList list = VireoLoopChunks::Empty();

@@ -1,4 +1,4 @@
-// What opening a file tells of the loop, and the frame positions of its transients, stored without the object layer.
+// Loop facts found while opening a file, and transient positions stored without the object layer.
 #include "audiofile/CAudioFileIO.h"
 #include "loops/VireoLoopCombinedTagsChunkDataTypes.h"
 #include "loops/VireoLoopTransients.h"
@@ -13,7 +13,7 @@
 namespace {
 
 constexpr std::uint32_t kFrames = 22050;
-constexpr std::size_t kSampleBytes = 2 * kFrames; // half a second at 44.1 kHz, mono, 16 bits
+constexpr std::size_t kSampleBytes = 2 * kFrames; // half a second of 16-bit mono at 44.1 kHz
 
 Bytes basicTagging(std::int32_t beats, std::int16_t fileType)
 {

@@ -1,4 +1,4 @@
-// Damaged loop files: what can be read is read, the rest is left out, and memory stays in proportion to the file.
+// Damaged loop files: what is readable is read, the rest is omitted, and memory stays proportional to the file.
 #include "LoopFiles.h"
 #include "loops/CombinedTaggingChunkAccess.h"
 #include "loops/FileInfoChunkAccess.h"
@@ -45,7 +45,7 @@ void operator delete(void* block, std::size_t) noexcept
 
 namespace {
 
-/// The most memory that reading the tags takes at once.
+/// Peak memory while reading the tags.
 std::size_t memoryToRead(const std::string& path, Tags& tags)
 {
     const VireoLoopChunkList list = VireoLoopChunks::Empty();
@@ -183,7 +183,7 @@ const Case inCAF[] = {
 
 } // namespace
 
-/// A chunk whose data object is of a class derived from the usual one, so that it is read by way of an archive.
+/// A chunk whose data object has a derived class, so that it is read through an archive.
 template <class Chunk, class Data>
 struct ReadByArchive : VireoLoopBaseChunk {
     struct Derived : Data {};
@@ -191,7 +191,7 @@ struct ReadByArchive : VireoLoopBaseChunk {
     const platform::Dictionary& tags() { return static_cast<Derived&>(chunkData()).dataDictionary(); }
 };
 
-/// What is read straight from the file is what archives say, as those of derived classes must still be told.
+/// Reading directly gives the same as the archives that derived classes still need.
 void expectWhatArchivesSay(const std::string& path)
 {
     VireoLoopFileInfoChunk info;
@@ -269,7 +269,7 @@ TEST_F(DamagedLoopFile, SaysWhatItsArchiveSays)
 
 namespace {
 
-/// Lets the file lose its second half ahead of one of the reads.
+/// Halves the file before one of the reads.
 struct ShrinkingFile {
     static inline int reads, shrinking;
     static inline std::string path;
@@ -307,7 +307,7 @@ TEST_F(DamagedLoopFile, ShrinkingWhileItIsRead)
                 manage(path, false).readChunks(list);
                 reads = ShrinkingFile::reads;
             }
-            // A chunk that the file ends in may lose its tail; nothing else changes.
+            // A chunk at the file's end may lose its tail; nothing else changes.
             for (const auto& [key, text] : tagsIn(list))
                 EXPECT_TRUE(key == "transients" || all.at(key).starts_with(text))
                     << fourCCText(container) << " at read " << read << ": " << key << "=" << text;

@@ -49,7 +49,7 @@ protected:
         original = audioFile(GetParam().container, chunks, GetParam().isAhead);
     }
 
-    /// Whether it was done, and the number of calls that changed the file.
+    /// Whether it succeeded, and the number of calls that changed the file.
     std::pair<bool, int> run(const Edit& edit, int failing, Fault fault)
     {
         std::filesystem::remove(folder / "file");
@@ -59,8 +59,8 @@ protected:
         return {isDone, FaultyDisk::calls};
     }
 
-    /// What must hold at every instant: the file opens, samples and the chunk of others are what they were, and each
-    /// tag is the old one or the new one.
+    /// Holds at every instant: the file opens, samples and foreign chunks are unchanged, and each tag is the old one or
+    /// the new one.
     void check(const Tags& before, const Tags& after)
     {
         const Chunks chunks = walkContainer(readFile(folder / "file"));

@@ -1,4 +1,4 @@
-// Loop chunks where there is no place for them: files of other kinds, ids that stand for nothing in CAF.
+// Loop chunks where they have no place: other kinds of files, and ids that mean nothing in CAF.
 #include "LoopFiles.h"
 
 #include "loops/VireoLoopGenericChunkData.h"

@@ -1,14 +1,14 @@
-// The chunks manager on real AIFF and CAF files: set, save, read, remove, and from one kind of file to the other.
+// The chunks manager on real AIFF and CAF files: set, save, read, remove, and convert between the two.
 #include "LoopFiles.h"
 
 #include <filesystem>
 
 namespace {
 
-/// Chunks of others, the same in every file.
+/// Foreign chunks, the same in every file.
 const Chunks others{{fourCC("cue "), "other"}, {fourCC("uuid"), std::string(40, 'u')}, {fourCC("uuid"), "short"}};
 
-/// A file that has all kinds of loop chunks, `times` over and ahead of the samples if so wished, the first ones first.
+/// A file with all kinds of loop chunks, each `times` times, before the samples if requested, the first ones first.
 Bytes taggedFile(const TemporaryFolder& folder, FourCC container, bool isAhead, const std::vector<std::size_t>& lengths)
 {
     Chunks tagged;
@@ -63,7 +63,7 @@ TEST(LoopFile, ThatIsNotThereIsNeitherWrittenNorRemovedFrom)
     EXPECT_FALSE(std::filesystem::exists(folder / "none"));
 }
 
-// An item that becomes longer and has samples behind it goes behind them: the second one was the first one then.
+// An item that grows and precedes samples moves behind them, which would make the second item the first one.
 TEST_P(LoopManager, ASecondItemOfAKindNeitherTakesThePlaceOfTheOneWrittenNorGoes)
 {
     for (const bool isAhead : {false, true}) {
@@ -81,7 +81,7 @@ TEST_P(LoopManager, ASecondItemOfAKindNeitherTakesThePlaceOfTheOneWrittenNorGoes
 
 namespace {
 
-/// The tags of `from`, by way of the objects, in a new file of the other kind.
+/// The tags of `from`, written through the objects to a new file of the other kind.
 std::string carried(const TemporaryFolder& folder, const std::string& from, FourCC to, const std::string& name)
 {
     const VireoLoopChunkList list = VireoLoopChunks::Empty();
@@ -100,7 +100,7 @@ TEST(LoopFile, WhatIsLostBetweenAIFFAndCAF)
         const char* what;
         FourCC from;
         platform::Dictionary tags;
-        Tags lost; // as they are read from the other file, "-" where nothing is
+        Tags lost; // as read from the other file; "-" if absent
     };
     const auto key = [](const char* name) { return std::string("VireoLoopCombinedTagsChunkData") + name; };
     const Loss losses[] = {

@@ -1,4 +1,4 @@
-// What is read of instruments, loops and markers that libsndfile writes into WAVE files.
+// Instruments, loops and markers in WAVE files of libsndfile.
 #include "loops/SamplerTags.h"
 #include "LoopFiles.h"
 #include "audiofile/SoundFile.h"

@@ -1,4 +1,4 @@
-// What libsndfile reads of the tags that are written into AIFF files.
+// Tags of AIFF files as libsndfile reads them.
 #include "LoopFiles.h"
 #include "audiofile/SoundFile.h"
 

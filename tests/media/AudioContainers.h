@@ -1,4 +1,4 @@
-// Audio containers built and walked by hand, with nothing of the library in between.
+// Audio containers built and walked by hand, without the library.
 #pragma once
 
 #include "media/userdata/AudioFileService.h"
@@ -13,7 +13,7 @@
 #include <utility>
 #include <vector>
 
-/// Ids and bodies, in file order.
+/// Ids and bodies in file order.
 using Chunks = std::vector<std::pair<FourCC, std::string>>;
 
 inline const std::string testSamples = "\1\2\3\4\5\6\7\10\11\12\13\14\15\16\17\20"; // 8 frames, mono, 16 bits
@@ -29,7 +29,7 @@ inline std::endian orderOf(FourCC container)
                                                                                           : std::endian::little;
 }
 
-/// The chunk that says: 16 bits, mono, 44100 Hz, and the one with the samples. For WAVE, RF64, AIFF and CAF.
+/// The chunk for 16-bit mono at 44100 Hz, and the one with the samples. For WAVE, RF64, AIFF and CAF.
 inline Chunks::value_type formatChunk(FourCC container)
 {
     ByteWriter writer(orderOf(container));
@@ -58,7 +58,7 @@ inline Chunks::value_type dataChunk(FourCC container)
     return {fourCC("data"), testSamples};
 }
 
-/// A whole file. "RF64" gets a "ds64", and states the sizes of the container and of "data" there only.
+/// A whole file. "RF64" gets a "ds64", which alone states the sizes of the container and of "data".
 inline Bytes buildContainer(FourCC container, const Chunks& chunks)
 {
     const bool caf = isCAF(container), rf64 = container == fourCC("RF64");
@@ -92,8 +92,8 @@ inline Bytes buildContainer(FourCC container, const Chunks& chunks)
     return writer.take();
 }
 
-/// The chunks that a strict reader finds, filler and "ds64" left out; every chunk must lie within the container, and
-/// the container within the file. Only filler may be cut short by the end of a CAF file.
+/// The chunks that a strict reader finds, without filler and "ds64". Every chunk must lie inside the container, and the
+/// container inside the file; only filler may be cut off by the end of a CAF file.
 inline Chunks walkContainer(BytesView bytes)
 {
     Chunks found;

@@ -1,4 +1,4 @@
-// What the audio-file service reads from files, creates, and refuses. Its edits: UserDataEditTest.cpp.
+// What the audio-file service reads, creates and refuses. Its edits: UserDataEditTest.cpp.
 #include "media/userdata/AudioFileService.h"
 
 #include "AudioContainers.h"
@@ -65,7 +65,7 @@ TEST(AudioFileService, CreatesWritesAndReadsLinearPCM)
         EXPECT_EQ(AudioFile::create(*urlOf(path), test.type, format, &status), nullptr);
         EXPECT_EQ(status, kStatusDuplicateName);
 
-        // User data find room ahead of the samples, so that these can still grow.
+        // User data fits before the samples, so that these can still grow.
         std::string samples(5 * format.bytesPerFrame, '\0');
         for (std::size_t i = 0; i < samples.size(); ++i)
             samples[i] = static_cast<char>(i + 1);
@@ -87,7 +87,7 @@ TEST(AudioFileService, CreatesWritesAndReadsLinearPCM)
         EXPECT_EQ(read.substr(0, 4 * format.bytesPerFrame), samples.substr(format.bytesPerFrame));
         EXPECT_EQ(itemsOf(*file, fourCC("note")), std::vector<std::string>{"item"});
         walkContainer(readFile(path));
-        // Nothing is said of speakers: of a channel mask of 0 encoders make files that decoders refuse.
+        // No speakers are stated: encoders turn a channel mask of 0 into files that decoders refuse.
         EXPECT_NE(loadBE<std::uint16_t>(readFile(path).data() + 56), 0xFEFF);
     }
 }
@@ -168,7 +168,7 @@ TEST(AudioFileService, UserDataAreAddressedByTypeAndIndex)
         EXPECT_EQ(file->removeUserData(type, 0), kStatusParameterError) << fourCCText(type);
     }
     EXPECT_EQ(readFile(path), before);
-    // Another handle's edit is seen.
+    // An edit through another handle is noticed.
     ASSERT_EQ(openAudio(path)->removeUserData(fourCC("midi"), 0), 0);
     EXPECT_EQ(itemsOf(*file, fourCC("midi")), std::vector<std::string>{""});
 }
@@ -185,7 +185,7 @@ TEST(AudioFileService, HostileFilesCostNothing)
         EXPECT_EQ(openAudio(folder.write("file", bytes), false, &status), nullptr) << bytes;
         EXPECT_EQ(status, kStatusParameterError);
     }
-    // 20 bytes that claim 4 GiB, sizes below zero, a size that overflows: opened, bounded by the file, not extended.
+    // 20 bytes that claim 4 GiB, negative sizes, a size that overflows: opened, bounded by the file, not extended.
     for (const std::string& bytes :
          {"RIFF\xFF\xFF\xFF\xFFWAVEnote\xFF\xFF\xFF\xFF"s,
           "FORM\x7F\xFF\xFF\xFF"
@@ -214,7 +214,7 @@ TEST(AudioFileService, CAFWhosePacketsHoldNoFramesIsReadByItsBits)
     EXPECT_EQ(format.bytesPerFrame, format.channelsPerFrame * format.bitsPerChannel / 8);
 }
 
-// EBU Tech 3306: sizes of chunks beside "data", by their ids.
+// EBU Tech 3306: a table holds the sizes of chunks other than "data" by id.
 TEST(AudioFileService, RF64SizesOfOtherChunksStandInATableOfThree)
 {
     TemporaryFolder folder;
@@ -231,7 +231,7 @@ TEST(AudioFileService, RF64SizesOfOtherChunksStandInATableOfThree)
         storeLE(bytes.data() + 20, std::uint64_t{bytes.size() + 36 - 8});
         storeLE(bytes.data() + 44, stated);
         bytes.insert(bytes.begin() + 48, table.begin(), table.end());
-        Bytes more(8 + 6); // so that a size that is not found in the table is told from the end of the file
+        Bytes more(8 + 6); // so that a size missing from the table differs from the end of the file
         storeBE(more.data(), fourCC("more"));
         storeLE(more.data() + 4, 6u);
         bytes.insert(bytes.end(), more.begin(), more.end());

@@ -1,4 +1,4 @@
-// What is off in containers: nothing in good ones, one finding for one fault.
+// Faults in containers: none in good files, one finding per fault.
 #include "media/containers/ContainerCheck.h"
 
 #include "media/AudioContainers.h"
@@ -46,7 +46,7 @@ struct ContainerFault {
     std::uint64_t offset, stated, found;
 };
 
-/// With `bytes` at `offset`.
+/// The file with `bytes` at `offset`.
 Bytes with(Bytes file, std::size_t offset, std::string_view bytes)
 {
     std::ranges::copy(bytesOf(bytes), file.begin() + static_cast<std::ptrdiff_t>(offset));
@@ -69,7 +69,7 @@ TEST(ContainerCheck, GoodContainersAreSilent)
         EXPECT_TRUE(findingsOf(buildContainer(container, chunksOf(container))).empty());
         EXPECT_TRUE(findingsOf(buildContainer(container, chunksOf(container, notes))).empty());
     }
-    // Legal: an open last chunk of CAF, samples ahead of "COMM", a size that leaves the last pad byte out.
+    // Legal: an open last chunk in CAF, samples before "COMM", a size without the last pad byte.
     Bytes caf = buildContainer(kCAFFile, chunksOf(kCAFFile));
     EXPECT_TRUE(findingsOf(with(caf, 56, std::string(8, '\xFF'))).empty());
     EXPECT_TRUE(findingsOf(buildContainer(kAIFFFile, {dataChunk(kAIFFFile), formatChunk(kAIFFFile)})).empty());
@@ -148,9 +148,9 @@ TEST(ContainerCheck, OneFaultIsOneFinding)
         EXPECT_EQ(found[0].offset, fault.offset);
         EXPECT_EQ(found[0].stated, fault.stated);
         EXPECT_EQ(found[0].found, fault.found);
-        EXPECT_EQ(found.size(), fault.kind == Kind::sizes64Differ ? 2u : 1u); // what is left over, or lacks, is told
+        EXPECT_EQ(found.size(), fault.kind == Kind::sizes64Differ ? 2u : 1u); // the surplus or the gap is reported too
     }
-    // These come with what they lead to.
+    // These faults entail others.
     const auto kindsOf = [](const Bytes& file) {
         std::vector<Kind> kinds;
         for (const ContainerFinding& finding : findingsOf(file))
@@ -159,7 +159,7 @@ TEST(ContainerCheck, OneFaultIsOneFinding)
     };
     EXPECT_EQ(kindsOf(cutTo(wave, 52)), (std::vector{Kind::containerIsCut, Kind::chunkIsCut}));
     EXPECT_EQ(kindsOf(out), (std::vector{Kind::chunkReachesOut, Kind::bytesBehind}));
-    EXPECT_EQ(kindsOf(with(late, 4, frames32(28))), // the format is looked for beyond
+    EXPECT_EQ(kindsOf(with(late, 4, frames32(28))), // the format is searched for beyond
               (std::vector{Kind::chunkBehind, Kind::formatIsLate}));
 }
 
@@ -167,7 +167,7 @@ TEST(ContainerCheck, NoBytesLeadAstray)
 {
     EXPECT_TRUE(findingsOf({}, kStatusParameterError).empty());
     EXPECT_TRUE(findingsOf(Bytes(100), kStatusParameterError).empty());
-    // Where nothing is known of the sound, a chunk without a name is not its format, and that is all.
+    // If nothing is known about the sound, a nameless chunk is not its format, and nothing more.
     const Bytes rex2 = fromHex("43415420 0000001E 52455832 48454144 00000006 000000000000 00000000 00000003 00000000");
     ASSERT_EQ(findingsOf(rex2).size(), 1u);
     EXPECT_EQ(findingsOf(rex2)[0].kind, Kind::idIsNoName);
@@ -176,7 +176,7 @@ TEST(ContainerCheck, NoBytesLeadAstray)
         const Bytes whole = buildContainer(container, chunksOf(container, {{fourCC("note"), "odd"}}));
         for (std::size_t length = 16; length < whole.size(); ++length) {
             const std::vector<ContainerFinding> found = findingsOf(cutTo(whole, length));
-            // Of the notes CAF needs none.
+            // CAF needs none of the notes.
             EXPECT_TRUE(!found.empty() || container == kCAFFile) << fourCCText(container) << length;
         }
         for (int i = 0; i < 2000; ++i) {
@@ -190,7 +190,7 @@ TEST(ContainerCheck, NoBytesLeadAstray)
             for (const ContainerFinding& finding : findings)
                 EXPECT_LE(finding.offset, mutant.size());
         }
-        // A read that fails is no end.
+        // A failed read is not an end.
         const MemoryBytes broken(whole, 40);
         HeaderWindow window(broken, broken.length());
         std::vector<ContainerFinding> findings;

@@ -45,7 +45,7 @@ Bytes rifx()
     return {out.view().begin(), out.view().end()};
 }
 
-/// `size` is that of the samples' chunk; the file's is unknown with it.
+/// `size` is that of the samples' chunk; if it is unknown, so is the file's.
 Bytes wave64(std::uint64_t size = 24 + 12)
 {
     constexpr std::string_view rest("\xF3\xAC\xD3\x11\x8C\xD1\0\xC0\x4F\x8E\xDB\x8A", 12);
@@ -162,7 +162,7 @@ TEST(ContainersToRead, BrokenOnesSaySo)
 
 TEST(ChannelLayouts, HaveASpeakerForEachChannelOfTheirTag)
 {
-    // The low half of a tag counts its channels.
+    // The low half of a tag is the number of channels.
     constexpr std::uint32_t tags[] = {
         0x640001, 0x650002, 0x6C0004, 0x6D0005, 0x6E0006, 0x6F0008, 0x710003, 0x720003, 0x730004, 0x740004,
         0x750005, 0x760005, 0x770005, 0x780005, 0x790006, 0x7A0006, 0x7B0006, 0x7C0006, 0x7D0007, 0x7E0008,

@@ -1,4 +1,4 @@
-// Frames in the format that the caller wants: linear PCM by the library, others through the seam of the decoder module.
+// Frames in the caller's format: linear PCM read by the library, others through the seam of the decoder module.
 #include "media/decoding/ConvertingReader.h"
 
 #include "AudioContainers.h"
@@ -205,7 +205,7 @@ TEST(ConvertingReader, ReadsThroughADecoderOfTheModule)
     EXPECT_EQ(readFrom<float>(*reader, 990, 20).size(), 10U);
     EXPECT_EQ(file.seeks, 1);
 
-    // After a failure the place is what it was, and the decoder is brought back to it.
+    // A failure keeps the position, and the decoder is brought back to it.
     file.failingSeek = 2;
     EXPECT_EQ(reader->seek(5), kStatusIOError);
     EXPECT_EQ(readFrom<float>(*reader, 100, 2)[0], 100.25F);

@@ -12,7 +12,7 @@ using platform::EmbeddedTag;
 
 namespace {
 
-/// "ID3v2 TIT2 TITLE=value|value" of each entry; what is no text as its size, kind and description.
+/// "ID3v2 TIT2 TITLE=value|value" for each entry; for data its size, kind and description.
 std::vector<std::string> wordsOf(const std::vector<EmbeddedTag>& tags)
 {
     std::vector<std::string> words;
@@ -48,7 +48,7 @@ std::string bigEndian(std::size_t size)
     return bytes;
 }
 
-/// The size of ID3v2.4: seven bits a byte.
+/// A size in ID3v2.4, with seven bits per byte.
 std::string syncSafe(std::size_t size)
 {
     std::string bytes;
@@ -141,10 +141,10 @@ TEST(EmbeddedTags, PicturesCommentsAndBytesOfProgramsAreTold)
     EXPECT_EQ(tagsOf(asBytes(header + tag)), expected);
 }
 
-// Some hundred KB of either ended the process by the stack.
+// Some hundred KB of either used to overflow the stack.
 TEST(EmbeddedTags, WhatIsNestedDeepDoesNotEndTheProcess)
 {
-    std::string chapters; // built from the outside, as the inner ones would be copied each time
+    std::string chapters; // built from the outside, to avoid copying inner ones each time
     constexpr std::size_t kDepth = 100000, kChapter = 10 + 2 + 16;
     for (std::size_t level = 0; level < kDepth; ++level)
         chapters +=
@@ -171,7 +171,7 @@ TEST(EmbeddedTags, AReadThatFailsIsAnError)
     }
 }
 
-// What tags say of sizes is not believed: files cut and changed at random give some answer.
+// Sizes in tags are not trusted: files cut and changed at random still give an answer.
 TEST(EmbeddedTags, DamagedFilesGiveSomeAnswer)
 {
     const TemporaryFolder folder;

@@ -1,4 +1,4 @@
-// Files of linear PCM that a test writes, and what a converting reader reads of them.
+// Files of linear PCM written by a test, and what a converting reader reads of them.
 #pragma once
 
 #include "media/decoding/ConvertingReader.h"
@@ -20,7 +20,7 @@ inline std::unique_ptr<platform::ConvertingReader> openReader(const std::string&
         status, error);
 }
 
-/// Values of `T` read from `frame` on, as many as there are up to `frames` frames.
+/// Reads values of `T` from `frame` on, up to `frames` frames.
 template <class T>
 std::vector<T> readFrom(platform::ConvertingReader& reader, std::int64_t frame, std::uint32_t frames)
 {
@@ -34,7 +34,7 @@ std::vector<T> readFrom(platform::ConvertingReader& reader, std::int64_t frame, 
     return values;
 }
 
-/// A file of `samples`, which stand in the file's own form.
+/// A file of `samples`, which are in the file's own format.
 template <class T>
 std::string writeAudio(const TemporaryFolder& folder, FourCC type, const platform::StreamDescription& format,
                        const std::vector<T>& samples)

@@ -43,7 +43,7 @@ std::size_t bytesOf(SampleFormat format, std::size_t count)
 TEST(SampleConversion, ClampsRoundsHalfToEvenAndSilencesNaN)
 {
     constexpr float infinity = std::numeric_limits<float>::infinity();
-    // Eight take the fast road, the rest the plain one; then the other way round.
+    // Eight samples take the fast road and the rest the plain one; then the other way round.
     std::vector<float> from{1.0F, -1.0F, 7.5F,  -infinity, infinity, NAN,      0.5F,
                             1.5F, 2.5F,  -2.5F, 32766.5F,  32767.5F, -32767.5F};
     std::transform(from.begin() + 6, from.end(), from.begin() + 6, [](float sample) { return sample / 32768; });
@@ -62,8 +62,8 @@ TEST(SampleConversion, ClampsRoundsHalfToEvenAndSilencesNaN)
     EXPECT_EQ(to, std::vector<std::int32_t>(9, INT32_MAX));
 }
 
-// Samples at the end of their bytes, where a sanitizer sees a read beyond them: random, among them every kind of float
-// that is no number.
+// Random samples at the end of their memory, where a sanitizer detects reads beyond them, including every kind of float
+// that is not a number.
 Bytes randomSamples(SampleFormat format, std::size_t offset, std::size_t count, std::mt19937& random)
 {
     Bytes bytes(offset + bytesOf(format, count));

@@ -19,7 +19,7 @@ std::array<float, 4> values(const SampleExtremes& extremes)
     return {extremes.lowest[0], extremes.lowest[1], extremes.highest[0], extremes.highest[1]};
 }
 
-// The roads that this processor can take.
+// The fast roads that this processor supports.
 std::vector<decltype(&platform::sampleExtremes)> fastRoads()
 {
     std::vector<decltype(&platform::sampleExtremes)> roads{platform::sampleExtremes};
@@ -30,7 +30,7 @@ std::vector<decltype(&platform::sampleExtremes)> fastRoads()
     return roads;
 }
 
-// Random bytes are every integer there is; of floats they are huge numbers, infinities and NaNs as well.
+// Random bytes cover all integers; as floats they include huge values, infinities and NaNs.
 TEST(SampleExtremes, FastRoadsEqualPlainRoadOnRandomBytes)
 {
     std::mt19937 random(20);

@@ -1,5 +1,5 @@
-// Frames at another sample rate than the file's: when they stand, how good they are, and that they are the same however
-// they were come to.
+// Frames at another sample rate than the file's: their times, their quality, and that they are the same however they
+// are reached.
 #include "ReaderFrames.h"
 #include "media/decoding/DecoderModule.h"
 #include "media/decoding/PolyphaseSums.h"
@@ -32,7 +32,7 @@ protected:
 
 constexpr SampleFormat kFloats{.bits = 32, .isFloat = true, .order = std::endian::native};
 
-/// A reader of a file of floats: what `sound` gives for frame and channel.
+/// A reader of a float file with the values of `sound` by frame and channel.
 std::unique_ptr<ConvertingReader> readerOf(const TemporaryFolder& folder, double rate, std::uint32_t channels,
                                            std::size_t frames, const std::function<double(std::size_t, int)>& sound)
 {
@@ -44,7 +44,7 @@ std::unique_ptr<ConvertingReader> readerOf(const TemporaryFolder& folder, double
     return openReader(writeAudio(folder, fourCC("WAVE"), format, samples));
 }
 
-/// Noise that every frame can be told by.
+/// Noise that identifies every frame.
 double noise(std::size_t frame, int channel)
 {
     std::uint64_t bits = (frame + 1) * 0x9E3779B97F4A7C15U + static_cast<std::uint64_t>(channel) * 0xBF58476D1CE4E5B9U;
@@ -59,7 +59,7 @@ std::function<double(std::size_t, int)> sine(double hertz, double rate)
     };
 }
 
-/// Signal to noise in decibels, of what should be a sine, away from the ends.
+/// Signal-to-noise ratio in decibels of an expected sine, away from the ends.
 double qualityOf(const std::vector<float>& samples, double hertz, double rate)
 {
     double signal = 0, noise = 0;
@@ -77,7 +77,7 @@ bool areSame(const std::vector<float>& a, const float* b)
     return std::memcmp(a.data(), b, a.size() * sizeof(float)) == 0;
 }
 
-/// Reads at 60 places, in pieces of several sizes, and compares with one read of everything.
+/// Reads at 60 positions, in pieces of several sizes, and compares with one read of everything.
 void expectSeeksToGiveWhatAFullReadGives(ConvertingReader& reader)
 {
     const std::uint32_t channels = reader.clientFormat().channelsPerFrame;
@@ -122,7 +122,7 @@ TEST_F(SampleRate, FramesStandAtTheirTimesAndAreCountedUpToTheEnd)
         EXPECT_EQ(readFrom<float>(*reader, 0, 50000).size(), test.expected);
         EXPECT_TRUE(readFrom<float>(*reader, std::numeric_limits<std::int64_t>::max(), 10).empty());
     }
-    // An impulse in the midst shows where a frame stands: frame 4410 is frame 4800.
+    // An impulse in the middle shows the position: frame 4410 becomes frame 4800.
     const auto reader = readerOf(folder, 44100, 1, 9000, [](std::size_t frame, int) { return frame == 4410 ? 1 : 0; });
     ASSERT_EQ(reader->setClientFormat(StreamDescription::packedPCM(48000, 1, kFloats)), 0);
     const auto samples = readFrom<float>(*reader, 0, 10000);
@@ -153,7 +153,7 @@ TEST_F(SampleRate, ASineComesBackAndLevelsStay)
         for (const float level : readFrom<float>(*reader, 1000, 7000))
             ASSERT_NEAR(level, 0.5, 1e-6) << rate;
     }
-    // Nothing that is above half the lower rate folds back.
+    // Nothing above half of the lower rate is aliased.
     reader = readerOf(folder, 48000, 1, frames, sine(23000, 48000));
     ASSERT_EQ(reader->setClientFormat(StreamDescription::packedPCM(44100, 1, kFloats)), 0);
     for (const float level : readFrom<float>(*reader, 1000, 70000))

@@ -1,4 +1,4 @@
-// Edits of user data that are cut short at each single call, and what becomes of files edited again and again.
+// Edits of user data that are cut short at each single call, and files that are edited again and again.
 #include "AudioContainers.h"
 #include "platform/core/Status.h"
 #include "support/FaultInjection.h"
@@ -12,7 +12,7 @@ using namespace platform;
 
 namespace {
 
-constexpr FourCC kItem = fourCC("uuid"); // the type that is edited; the others must not notice
+constexpr FourCC kItem = fourCC("uuid"); // the type that is edited; others must not change
 
 std::vector<std::string> bodiesOf(const Chunks& chunks, FourCC id)
 {
@@ -110,7 +110,7 @@ std::vector<Edit> editsOf(const std::vector<std::string>& items)
 
 class UserDataEdit : public testing::TestWithParam<Layout> {
 protected:
-    /// Opens, applies, closes; the status, and the number of calls that changed the file.
+    /// Opens, applies, closes; returns the status and the number of calls that changed the file.
     std::pair<std::int32_t, int> run(const Edit& edit, int failing, Fault fault)
     {
         std::filesystem::remove(folder / "file"); // some file systems flush a file that is written over
@@ -121,7 +121,7 @@ protected:
         return {status, FaultyDisk::calls};
     }
 
-    /// What must hold at every instant; the items that a reader finds.
+    /// Checks what must hold at every instant, and returns the items that a reader finds.
     std::vector<std::string> check()
     {
         const Bytes bytes = readFile(folder / "file");
@@ -137,7 +137,7 @@ protected:
         return bodiesOf(chunks, kItem);
     }
 
-    /// Killed between the two steps: the items up to the old one, or one behind it, and then all from the new one on.
+    /// Killed between the two steps: the items up to the old one, or one beyond it, and then all from the new one on.
     static bool isBetweenTheSteps(const std::vector<std::string>& found, const std::vector<std::string>& before,
                                   const std::vector<std::string>& after, std::size_t index)
     {
@@ -303,7 +303,7 @@ TEST(UserDataEdit, BytesBehindTheContainer)
     ASSERT_EQ(setItem(*file, kItem, 0, std::string(300, 'i')), 0); // needs their place
     EXPECT_EQ(walkContainer(readFile(folder / "tag")).size(), 3u);
 
-    // A recording that was killed: its sizes are not filled in, and what looks like a tail is its samples.
+    // A recording that was killed: its sizes were not filled in, and the apparent tail is its samples.
     wave = buildContainer(fourCC("WAVE"), {formatChunk(fourCC("WAVE")), {fourCC("data"), ""}});
     wave.insert(wave.end(), 1000, std::byte{'s'});
     file = openAudio(folder.write("killed", wave));
@@ -314,7 +314,7 @@ TEST(UserDataEdit, BytesBehindTheContainer)
 TEST(UserDataEdit, StaleAndMissingSizesAreSettledBeforeAnythingFollows)
 {
     TemporaryFolder folder;
-    // "data" longer than the file, as a broken-off download has it, and an odd last chunk whose pad byte is missing.
+    // "data" longer than the file, as in an interrupted download, and an odd last chunk without its pad byte.
     Bytes cut = build({"", fourCC("AIFF"), "FD"});
     cut.resize(cut.size() - 5);
     Bytes unpadded = build({"", fourCC("WAVE"), "FDo"}); // 23 bytes and the pad
@@ -361,7 +361,7 @@ TEST(UserDataEdit, ExtendingTheSamplesCutShortLeavesWhatWasThere)
             }
 }
 
-// Filler of two odd chunks without pad bytes has an odd size, and a zero behind it passes for its own pad byte.
+// Two odd chunks without pad bytes become filler of odd size, and a zero after it would pass for its pad byte.
 TEST(UserDataEdit, MissingPadsAheadOfAnIdThatBeginsWithZero)
 {
     TemporaryFolder folder;
@@ -384,7 +384,7 @@ TEST(UserDataEdit, MissingPadsAheadOfAnIdThatBeginsWithZero)
     }
 }
 
-// The "ds64" holds the size of the first "data". Once, putting a second one right gave its size to the first.
+// The "ds64" holds the size of the first "data". A correction of a second one once changed that of the first.
 TEST(UserDataEdit, ASecondDataChunkHasASizeOfItsOwn)
 {
     constexpr FourCC rf64 = fourCC("RF64");
@@ -401,7 +401,7 @@ TEST(UserDataEdit, ASecondDataChunkHasASizeOfItsOwn)
     EXPECT_EQ(itemsOf(*file, kItem), std::vector<std::string>{"item"});
 }
 
-// An id of zeros with a size beyond the end: put right, it would be all zeros, and nothing behind it would be found.
+// An id of zeros with a size beyond the end would become all zeros when corrected, and hide whatever follows.
 TEST(UserDataEdit, NothingIsPutBehindCAFSamplesThatAreNotThere)
 {
     const FourCC caf = fourCC("caff");

@@ -61,8 +61,7 @@ TEST_F(BookmarkTest, ASafelySavedFileWinsOverTheOldOneElsewhere)
 
 TEST_F(BookmarkTest, AnInodeUsedAgainIsNotTakenForTheFile)
 {
-    // The bytes of a bookmark whose file is gone and whose inode another file has now: the inode number is right, birth
-    // time and handle are not.
+    // The bookmark of a deleted file whose inode number another file has now; birth time and handle differ.
     const std::string other = folder.write("songs/one/loops/other.wav", "another file");
     const Bytes ofOther = makeBookmark(*urlOf(other), {}).value();
     std::copy_n(ofOther.begin() + 16, 8, bookmark.begin() + 16);
@@ -106,7 +105,7 @@ TEST_F(BookmarkTest, DamagedBytesAreRefusedAndNeverHarm)
         damaged[offset] = std::byte(value);
         EXPECT_TRUE(refused(damaged)) << offset;
     }
-    // Any one bit: whatever comes out, it comes out without harm.
+    // With any single bit changed, resolving does no harm.
     for (std::size_t bit = 0; bit < bookmark.size() * 8; ++bit) {
         Bytes damaged = bookmark;
         damaged[bit / 8] ^= std::byte(1 << bit % 8);

@@ -18,7 +18,7 @@ TEST(FileHandle, FindsTheItemAfterARenameInItsFolder)
     EXPECT_EQ(pathOf(urlFromFileHandle(handle)), path);
     EXPECT_EQ(catalogName(handle).utf8(), "take.wav");
 
-    // Another file takes the name; the handle stays with the item.
+    // Another file takes the name; the handle follows the item.
     fs::rename(path, folder / "renamed.wav");
     folder.write("take.wav", "two");
     EXPECT_EQ(pathOf(urlFromFileHandle(handle)), folder / "renamed.wav");
@@ -89,7 +89,7 @@ TEST(DisplayName, ComesFromDesktopEntriesInTheUsersLanguage)
     EXPECT_EQ(displayName(*urlOf(folder.write("x.wav", ""))).utf8(), "x.wav");
     EXPECT_TRUE(displayName(*urlOf(folder / "missing")).isNull());
 
-    // What is no entry, or far too long for one, leaves the folder its own name.
+    // A missing or far too long entry leaves the folder its own name.
     for (const std::string& content : {std::string("[Desktop Entry"), std::string("Name=x"), std::string(100000, 'x'),
                                        std::string("[Desktop Entry]\nName=\xFF")}) {
         folder.write("music/.directory", content);

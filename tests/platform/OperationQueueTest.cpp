@@ -10,7 +10,7 @@
 using namespace platform;
 using namespace std::chrono_literals;
 
-// An idle thread ends after a second: the second round comes while those of the first do.
+// Idle threads end after a second: the second round arrives while those of the first are ending.
 TEST(BackgroundWork, IsRunBesideAllOtherAlsoByThreadsThatAreAboutToEnd)
 {
     constexpr int kMany = 64;

@@ -6,7 +6,7 @@ namespace {
 
 using namespace platform;
 
-/// A binary list of the objects, numbered in order; offsets and references of one byte.
+/// A binary list of the objects, numbered in order; offsets and references have one byte.
 std::string binaryList(const std::vector<std::string>& objects, unsigned char top = 0)
 {
     std::string file = "bplist00";
@@ -99,7 +99,7 @@ TEST(PropertyListBinary, LenientReadingLeavesOutWhatCannotBeRead)
     const auto lenient = [](const std::vector<std::string>& objects) {
         return readPropertyList(bytesOf(binaryList(objects)), nullptr, PropertyListReading::lenient);
     };
-    // Whole objects of types that there are not, so that nothing else is wrong with them.
+    // Complete objects of unknown types, so that nothing else is wrong with them.
     for (const char marker : {'\x00', '\x07', '\x0A', '\x15', '\x1F', '\x21', '\x24', '\x30', '\x32', '\x34', '\x80'}) {
         const std::string object = marker + zeros;
         EXPECT_FALSE(readPropertyList(bytesOf(binaryList({object})))) << int{marker};
@@ -124,7 +124,7 @@ TEST(PropertyListBinary, SharedObjectsDoNotUnfoldWithoutLimit)
     EXPECT_NE(error.description.find("unfold"), std::string::npos);
 }
 
-// The writer must not share so much that a reader with a budget refuses its own files.
+// The writer must not share so much that readers with a budget refuse its files.
 TEST(PropertyListBinary, ALongTextUsedVeryOftenReadsBack)
 {
     const Value value = Array(3000, std::string(20'000, 'x'));

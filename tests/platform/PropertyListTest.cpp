@@ -21,7 +21,7 @@ Value nested(int depth)
     return value;
 }
 
-/// One of every kind, in the sizes at which encodings change.
+/// One value of every kind, in the sizes at which encodings change.
 Value sample()
 {
     Array integers;
@@ -44,7 +44,7 @@ Value sample()
     };
 }
 
-// What python3's plistlib writes we read, and the other way round.
+// We read what python3's plistlib writes, and vice versa.
 TEST(PropertyList, AgreesWithAnotherImplementation)
 {
     if (std::system("python3 -c 'import plistlib' 2>/dev/null") != 0)

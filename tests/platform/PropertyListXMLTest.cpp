@@ -106,7 +106,7 @@ TEST(PropertyListXML, IsWrittenForPeopleToo)
         "\t<key>c</key>\n\t<dict/>\n</dict>\n</plist>\n");
 }
 
-// The parser's own refusals are those of XMLParserTest.cpp; that it was given other limits must not lift them.
+// XMLParserTest.cpp covers the parser's own refusals; other limits must not disable them.
 TEST(PropertyListXML, LongTextIsNoLongTag)
 {
     EXPECT_FALSE(readPropertyList(bytesOf("<!DOCTYPE plist [<!ENTITY a 'x'>]>" + xmlList("<true/>"))));

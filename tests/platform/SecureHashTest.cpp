@@ -9,7 +9,7 @@ namespace {
 
 using namespace platform;
 
-// The key of a lock: should it change, processes with another version of the library would no longer meet.
+// The key of a lock: if it changed, processes with another version of the library would no longer meet.
 TEST(SecureHash, ThePathsBytesAreTheKey)
 {
     const struct {

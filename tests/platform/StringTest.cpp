@@ -19,7 +19,7 @@ TEST(String, TakesWellFormedUTF8Only)
     for (const std::string& text : valid)
         EXPECT_EQ(String::fromUTF8(text).utf8(), text) << text;
 
-    // Alone, overlong, cut short; surrogates; past the last.
+    // A lone, an overlong, an incomplete sequence; surrogates; beyond the last character.
     const std::string invalid[] = {"\x80",     "\xC0\x80",         "\xC3",         "\xED\xA0\x80",
                                    "\xE2\x82", "\xF4\x90\x80\x80", "\xF0\x9F\x8E", "\xFF"};
     for (const std::string& bytes : invalid)
@@ -30,7 +30,7 @@ TEST(String, TakesWellFormedUTF8Only)
 TEST(String, ConvertsToUTF16AndBack)
 {
     std::u16string units;
-    // Every scalar value of one unit; of those that need two, both ends and 1,024 between them.
+    // Every scalar value of one unit; of those with two units, both ends and 1,024 in between.
     for (std::uint32_t scalar = 0; scalar <= 0x10FFFF; scalar += scalar < 0x10000 ? 1 : 0x3FF) {
         if (scalar >= 0x10000)
             (units += static_cast<char16_t>(0xD7C0 + (scalar >> 10))) +=
@@ -70,8 +70,8 @@ TEST(TextEncoding, EveryByteOfTheWesternEncodingDecodes)
         const char text[] = {static_cast<char>(byte), '\0'};
         const String decoded = decodeCString(text, kTextEncodingWestern);
         ASSERT_EQ(decoded.utf16().size(), 1U) << byte;
-        // The C library's table, where it is installed, is an independent one; it has a Greek letter for 0xC6, and
-        // for the sign at 0xF0, which Unicode does not have, another private value.
+        // The C library's table, if installed, is an independent reference; it has a Greek letter for 0xC6, and another
+        // private value for the sign at 0xF0, which Unicode lacks.
         if (converter == reinterpret_cast<iconv_t>(-1) || byte == 0xC6 || byte == 0xF0)
             continue;
         char in = text[0], out[8] = "", *from = &in, *to = out;

@@ -196,7 +196,7 @@ TEST(URL, PathStylesOfOtherSystems)
             EXPECT_EQ(pathOf(url, c.style), c.again) << c.text;
         }
     }
-    // What a style would read back as something else it does not get.
+    // A path that a style would read back differently has no form in it.
     for (const char* path : {"/a\\b", "C:/a", "a\\b"})
         EXPECT_EQ(pathOf(fromPath(path), windows), "(null)") << path;
     for (const char* path : {"/", "/a", "/Volumes", "/Volumes/.", "/Volumes/..", "/Volumes/a/../b"})

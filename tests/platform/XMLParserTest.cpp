@@ -18,7 +18,7 @@ Bytes bytesFrom(std::string_view text)
     return Bytes(bytes.begin(), bytes.end());
 }
 
-/// Gives one byte at a time, and at the end a status.
+/// Returns one byte at a time, and a status at the end.
 class SlowStream : public InputStream {
 public:
     SlowStream(std::string_view text, std::ptrdiff_t end) : text_(text), end_(end) {}
@@ -36,7 +36,7 @@ private:
     std::ptrdiff_t end_;
 };
 
-/// Writes what it hears down again.
+/// Writes down the events that it receives.
 class Writer final : public XMLHandler {
 public:
     void startElement(std::string_view name, const XMLAttributes& attributes) override
@@ -58,7 +58,7 @@ public:
     XMLParser* parser = nullptr;
 };
 
-/// What was heard; behind it " ! " and the error.
+/// The events; followed by " ! " and the error.
 std::string heard(InputStream& stream)
 {
     Writer writer;
@@ -162,7 +162,7 @@ TEST(XMLParser, LongTextIsNoLongTag)
     EXPECT_EQ(heard(behindBlanks), "<a x='" + value + "'></a>.");
 }
 
-// The same tag is taken or refused wherever it stands, and however the bytes come.
+// Whether a tag is accepted does not depend on its position, nor on how the bytes arrive.
 TEST(XMLParser, TheLimitOfATagIsTheSameEverywhere)
 {
     constexpr std::size_t limit = 16 * 1024;
@@ -179,7 +179,7 @@ TEST(XMLParser, TheLimitOfATagIsTheSameEverywhere)
             }
 }
 
-/// Where the parser says that the elements "b" begin.
+/// Records the positions that the parser reports for elements "b".
 class Places final : public XMLHandler {
 public:
     void startElement(std::string_view name, const XMLAttributes&) override
@@ -194,7 +194,7 @@ public:
     XMLParser* parser = nullptr;
 };
 
-// The start of a long line may be gone when a tag of several lines ends: its column is not known then.
+// The start of a long line may be discarded when a tag over several lines ends; its column is unknown then.
 TEST(XMLParser, AColumnIsTrueOrUnknown)
 {
     bool wasUnknown = false;

@@ -1,4 +1,4 @@
-// A project package in a folder of its own, written by hand.
+// A project package in its own folder, written by hand.
 #pragma once
 
 #include "platform/PropertyList.h"
@@ -28,7 +28,7 @@ public:
         std::filesystem::rename(path(), folder_ / name);
         name_ = name;
     }
-    /// Writes a file of the package, and the folders around it.
+    /// Writes a file of the package, and creates the folders around it.
     void write(const std::string& item, BytesView content) const
     {
         std::filesystem::create_directories(std::filesystem::path(*this / item).parent_path());

@@ -11,7 +11,7 @@ using Info = ProjectInformation;
 
 class Backups {
 public:
-    /// Names, oldest first; equal times where `sameTime`.
+    /// Names, oldest first; `sameTime` gives all the same time.
     explicit Backups(const std::vector<std::string>& names, bool sameTime = false)
     {
         const auto start = fs::file_time_type::clock::now() - std::chrono::hours(1);
@@ -101,7 +101,7 @@ TEST(ProjectBackups, PurgingKeepsTheOneThatWasMadeAndTheOneChangedLast)
         EXPECT_TRUE(Info::purgeBackupsForBundleURL(backups.package().url(), 0, most, urlOf(backups.path(kept))));
         return backups.names();
     };
-    // By data the oldest first: an exchange put old data into 01 just now.
+    // Oldest data first: an exchange has just put old data into 01.
     const Names there{"00", "01", "02", "03"};
     for (const auto& [most, left] : {std::pair(4, there), std::pair(3, Names{"00", "01", "03"}),
                                      std::pair(2, Names{"00", "01"}), std::pair(1, Names{"00"})}) {

@@ -11,7 +11,7 @@ namespace {
 using namespace platform;
 
 /// Rows: values 0 to 19. Columns: inside the package, in a project folder, older kinds 1 and 6, 2, 4. "A/" is the
-/// alternative's folder; "." the project folder itself.
+/// alternative's folder, "." the project folder itself.
 constexpr const char* kNames[20][5] = {
     {nullptr, nullptr, nullptr, nullptr, nullptr},
     {"A/Previews", "A/Previews", nullptr, nullptr, nullptr},
@@ -35,7 +35,7 @@ constexpr const char* kNames[20][5] = {
     {"Media/Samples/Quick Sampler", "Samples/Quick Sampler", nullptr, nullptr, nullptr},
 };
 
-/// A project of each kind, fresh for each case.
+/// A project of each kind, created for each case.
 struct Kind {
     const char* name;
     int column; // of kNames, for the layout that the project decides on

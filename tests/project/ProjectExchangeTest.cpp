@@ -1,4 +1,4 @@
-// The exchange of an alternative's data with a backup's, cut short at every call that it makes.
+// The exchange of an alternative's data with a backup's, interrupted at every call that it makes.
 #include "PackageOnDisk.h"
 #include "support/FaultInjection.h"
 #include "support/QuietLog.h"
@@ -28,7 +28,7 @@ Tree contentOf(const std::string& folder)
     return tree;
 }
 
-/// An alternative with all that takes part, a backup with less, and another backup.
+/// An alternative with all exchanged items, a backup with fewer, and another backup.
 class Exchange {
 public:
     Exchange()
@@ -57,7 +57,7 @@ public:
     const PackageOnDisk& package() const { return package_; }
     auto interrupted() const { return Info::interruptedExchangeForBundleURL(package_.url(), 0); }
 
-    /// Wherever things are: each content once, and nothing else but the record.
+    /// Each content exists exactly once, wherever it is, and nothing else but the record.
     void expectAllThere() const
     {
         std::multimap<std::string, int> expected, found;
@@ -95,12 +95,12 @@ TEST(ProjectExchange, TakesEverythingWithIt)
     EXPECT_FALSE(exchange.interrupted());
 }
 
-/// Every call that changes something, with whether names can be exchanged in one step.
+/// Every call that changes something, with and without an exchange of names in one step.
 using Step = std::tuple<Call, bool>;
 
 class ProjectExchangeFaults : public testing::TestWithParam<Step> {
 protected:
-    /// An exchange in which the call fails from the `nth` time on, `times` times; `wasLast` when it was not made so
+    /// An exchange in which the call fails from the `nth` time on, `times` times; `wasLast` if it was called less
     /// often.
     bool exchangeWithFault(const Exchange& exchange, int error, int nth, int times)
     {
@@ -185,7 +185,7 @@ TEST(ProjectExchange, KilledAtEveryChange)
             ASSERT_EQ(waitpid(child, &status, 0), child);
             survived = WIFEXITED(status);
             exchange.expectAllThere();
-            // One that was killed behind the last change has nothing to settle: the record is gone, and all is done.
+            // A process killed after the last change leaves nothing to settle: the record is gone and all is done.
             if (!survived && (exchange.interrupted() || exchange.now() != exchange.after())) {
                 EXPECT_TRUE(exchange.exchange());
             }
@@ -207,7 +207,7 @@ TEST(ProjectExchange, WhatWasReplacedMeanwhileStays)
     }
     ASSERT_TRUE(exchange.interrupted());
     EXPECT_FALSE(exchange.interrupted()->isComplete);
-    // An application saves: a new file takes the place of the project data.
+    // An application saves: a new file replaces the project data.
     exchange.package().write(std::string(kAlternative) + "/new", std::string_view("saved anew"));
     fs::rename(exchange.package() / (std::string(kAlternative) + "/new"),
                exchange.package() / (std::string(kAlternative) + "/ProjectData"));
@@ -256,7 +256,7 @@ TEST(ProjectExchange, ThreeRenamingsWhereNamesCannotBeExchanged)
     }
 }
 
-/// One with the first backup that came to its end, or to its middle, and whose record is left.
+/// An exchange with the first backup that reached its end or its middle, and whose record is left.
 class CutShort : public Exchange {
 public:
     explicit CutShort(bool isComplete, const std::string& backup = kFirst)

@@ -12,7 +12,7 @@ namespace {
 using namespace platform;
 using Info = ProjectInformation;
 
-/// Runs a script of another reader and writer of property lists.
+/// Runs a script that reads and writes property lists independently.
 void runPython(const std::string& script, const std::string& argument)
 {
     const std::string command = "python3 - '" + argument + "'";
@@ -102,7 +102,7 @@ assert plistlib.loads(raw) == {
     'VariantNamesV2': {'0': '{PROJECT_NAME}', '1': '{PROJECT_NAME} ({PROJECT_NAME} mix)', '2': 5}}, plistlib.loads(raw)
 )",
               folder.path().string());
-    // Into the file itself: a second name keeps seeing it.
+    // Writes into the file itself: a second name still leads to it.
     const std::string file = folder / "Song.fuguex/Resources/ProjectInformation.plist";
     fs::create_hard_link(file, folder / "second");
     ASSERT_TRUE(Info::writeInfoDictionaryToURL(Dictionary{}, urlOf(file)));
@@ -192,7 +192,7 @@ TEST(ProjectInformation, MetaDataFallsBackToItsCopyAndIsKept)
     EXPECT_EQ(project->loadMetaDataForVariant(2), nullptr);
     EXPECT_EQ(project->loadMetaDataForVariant(-1), nullptr);
     EXPECT_EQ(project->loadMetaDataForVariant(99999999999), nullptr);
-    // What was read stays; what failed is tried again.
+    // What was read is kept; what failed is tried again.
     fs::remove(package / "Alternatives/000/MetaData.bak");
     package.writeMetaData({{"SampleRate", 96000}}, "Alternatives/002");
     EXPECT_EQ(project->sampleRate(0), 44100U);
@@ -215,7 +215,7 @@ TEST(ProjectInformation, OneValueThatCannotBeReadCostsNoOther)
     EXPECT_EQ(project->variationNameForIndex(0), "a");
     EXPECT_EQ(project->sampleRate(0), 96000U);
     EXPECT_EQ(project->filesUsedByAnyVariant(ProjectMediaKind::audio).size(), 2U);
-    // Who is going to write it back must not lose what it cannot hold.
+    // A caller who will write the dictionary back must not lose what it cannot represent.
     EXPECT_FALSE(Info::infoDictionaryFromProjectBundleURL(package.url()));
 }
 
@@ -234,7 +234,7 @@ TEST(ProjectInformation, ValuesOfTheWrongShapeReadAsAbsent)
         for (const char* key : {"AudioFiles", "ImpulsResponsesFiles", "VideoFiles"})
             metaData[key] = value;
         metaData["SongKey"] = metaData["SongGenderKey"] = value.get<std::string>() != nullptr ? Value(4) : value;
-        // Only the binary form holds a number that is none.
+        // Only the binary form can hold a NaN.
         package.write("Resources/ProjectInformation.plist", *writePropertyList(info, PropertyListFormat::binary));
         package.write("Alternatives/000/MetaData.plist", *writePropertyList(metaData, PropertyListFormat::binary));
         const auto project = package.open();

@@ -15,7 +15,7 @@ namespace {
 
 constexpr unsigned int kRefused = CFileServer::kRefused;
 
-/// Writes 16-bit samples; the sample of a frame and channel comes from `sample`.
+/// Writes 16-bit samples, computed by `sample` from frame and channel.
 template <class Sample>
 CFileRef writeAudio(const TemporaryFolder& folder, const char* name, int channels, long frames, Sample sample,
                     long rate = 44100)
@@ -122,7 +122,7 @@ TEST(CFileServer, RefusalsAndFailures)
         EXPECT_EQ(server.Register(1, &good), 0U);
     }
     {
-        FaultInjector faults; // gone between the look and the opening
+        FaultInjector faults; // deleted between the check and the opening
         faults.fail(Call::openFile, ENOENT, 1, 100);
         faults.fail(Call::openFileWithoutLinks, ENOENT, 1, 100);
         EXPECT_EQ(server.Register(1, &good), 0U);
@@ -172,7 +172,7 @@ TEST(CFileServer, EqualChannelsAreHeldOnce)
 TEST(CFileServer, MemoryThatIsNotThereIsNotTaken)
 {
     const TemporaryFolder folder;
-    // A sparse CAF file of 16-bit mono, four million million bytes, all of which are there.
+    // A sparse CAF file of 16-bit mono with 2^42 bytes.
     constexpr std::int64_t length = 1LL << 42;
     std::string image("caff\0\1\0\0desc\0\0\0\0\0\0\0\x20\x40\xE5\x88\x80\0\0\0\0lpcm\0\0\0\0\0\0\0\x02\0\0\0\1"
                       "\0\0\0\1\0\0\0\x10"
@@ -185,7 +185,7 @@ TEST(CFileServer, MemoryThatIsNotThereIsNotTaken)
         GTEST_SKIP() << "no files of that size";
     CFileServer server(2);
     EXPECT_EQ(server.Register(1, &sparse), 0U);
-    // Fewer frames than can be counted, and still more than fits.
+    // A number of frames that can be counted but does not fit in memory.
     const std::uint64_t frames = platform::availableMemory() / sizeof(float) + 1'000'000;
     fs::resize_file(folder / "sparse.caf", 68 + frames * 2);
     if (frames < UINT32_MAX) {

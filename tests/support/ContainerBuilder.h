@@ -1,5 +1,4 @@
-// Images of chunked containers for tests, built chunk by chunk: sound ones, and damaged ones by a stored size that is
-// not the true one.
+// Builds container images for tests chunk by chunk: intact ones, and ones with a wrong stored size.
 #pragma once
 
 #include "audiofile/CAudioFileIO.h"
@@ -9,7 +8,7 @@
 #include <optional>
 #include <string_view>
 
-/// RIFF, RF64 and BW64 with little-endian sizes, everything else big-endian; "caff" with the chunk headers of CAF.
+/// RIFF, RF64 and BW64 have little-endian sizes, all others big-endian; "caff" has CAF's chunk headers.
 class ContainerBuilder {
 public:
     explicit ContainerBuilder(std::string_view id, std::string_view formType = "WAVE");
@@ -20,15 +19,15 @@ public:
         return chunk(id, bytesOf(body), storedSize);
     }
     ContainerBuilder& chunk(std::string_view id, std::size_t zeros) { return chunk(id, Bytes(zeros)); }
-    /// The chunk without the pad byte that its odd size asks for.
+    /// Adds the chunk without the pad byte that its odd size requires.
     ContainerBuilder& unpadded(std::string_view id, std::string_view body);
-    /// The chunk that describes 16-bit mono samples.
+    /// Adds the chunk that describes 16-bit mono samples.
     ContainerBuilder& format(std::uint32_t frames = 0);
-    /// A "ds64" of 28 bytes and a table.
+    /// Adds a "ds64" of 28 bytes and a table.
     ContainerBuilder& ds64(std::uint64_t riffSize, std::uint64_t dataSize,
                            std::initializer_list<std::pair<FourCC, std::uint64_t>> table = {});
 
-    /// The image, its container size set to what is there or to `storedSize`.
+    /// The image, with the real container size or `storedSize`.
     Bytes bytes(std::optional<std::uint32_t> storedSize = {}) const;
 
 private:
@@ -38,7 +37,7 @@ private:
 
 /// The body of a "fmt " chunk of 16 bytes.
 Bytes waveFormat(int tag, int channels, int rate, int blockAlign, int bits);
-/// The body of a CAF "desc" chunk. The numbers: flags, bytes and frames in a packet, channels, bits.
+/// The body of a CAF "desc" chunk. The numbers are flags, bytes and frames per packet, channels, bits.
 Bytes cafDescription(double rate, std::string_view format, const std::array<std::uint32_t, 5>& numbers);
 
 /// Opens a memory file that holds a copy of the bytes.
@@ -49,7 +48,7 @@ struct MemoryAudioFile : CAudioFileIO {
         openInMemory(*this, content, mode);
     }
 };
-/// What an open memory file holds.
+/// The content of an open memory file.
 BytesView contentOf(const CAudioFileIO& file);
-/// The chunks as ForEachChunk lists them: "fmt :16 data:4".
+/// The chunks as listed by ForEachChunk: "fmt :16 data:4".
 std::string listing(CAudioFileIO& file);

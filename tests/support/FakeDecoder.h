@@ -1,5 +1,5 @@
-// A file of a coding that only a module decodes, as far as the tests need one: frame n holds n, and n + 0.5 on the
-// second channel. Gives at most 7 frames a call, as decoders of packets do.
+// A file of a coding that only a module decodes: frame n holds n, and n + 0.5 on the second channel. Delivers at most 7
+// frames per call, as packet decoders do.
 #pragma once
 
 #include "media/decoding/AudioDecoder.h"
@@ -15,15 +15,15 @@ public:
         FourCC formatId = fourCC(".mp3");
         FourCC fileType = fourCC("MPG3");
         std::uint64_t frames = 1000;
-        std::uint64_t framesThere = ~std::uint64_t{0};          // where the file ends ahead of them
+        std::uint64_t framesThere = ~std::uint64_t{0};          // fewer than promised
         std::optional<std::int64_t> validFrames = std::nullopt; // of the packet table
         bool hasFile = true;
         int seeks = 0;                            // done so far
-        int failingSeek = 0;                      // the number of the one that fails
+        int failingSeek = 0;                      // number of the seek that fails
         std::uint64_t broken = ~std::uint64_t{0}; // a frame that cannot be read
     };
 
-    /// While it lives, files that are no linear PCM are opened as `file`; rates are converted by the true module.
+    /// During its lifetime, files other than linear PCM are opened as `file`; the real module converts rates.
     class Module {
     public:
         explicit Module(File& file)
@@ -49,7 +49,7 @@ public:
                                                            makeResampler};
     };
 
-    /// While it lives, there is no module.
+    /// During its lifetime, there is no module.
     class NoModule {
     public:
         NoModule() { platform::replaceDecoderModule(&none); }
@@ -98,7 +98,7 @@ public:
     }
 
 private:
-    /// Knows its type, and takes no property.
+    /// Knows its type and accepts no property.
     class Handle final : public platform::AudioHandle {
     public:
         explicit Handle(FourCC type) : AudioHandle(Kind::file), type_(type) {}

@@ -1,4 +1,4 @@
-// Faults at the system-call seam: a test replaces entries of the call table and has them back when it ends.
+// Faults at the system-call seam: a test replaces entries of the call table, which are restored when it ends.
 #pragma once
 
 #include "platform/SystemCalls.h"
@@ -12,7 +12,7 @@
 #include <signal.h>
 #include <unistd.h>
 
-/// Restores the call table when it goes out of scope: assign to `platform::systemCalls()` freely meanwhile.
+/// Restores the call table at the end of the scope; `platform::systemCalls()` may be changed freely meanwhile.
 class SystemCallGuard {
 public:
     SystemCallGuard() : saved_(platform::systemCalls()) {}
@@ -50,7 +50,7 @@ enum class Call {
     count
 };
 
-/// Counts the calls of the table and makes some of them fail, until it goes out of scope. One at a time.
+/// Counts calls of the table and makes some fail, until the end of the scope. Only one at a time.
 class FaultInjector {
 public:
     FaultInjector()
@@ -88,17 +88,17 @@ public:
     ~FaultInjector() { current_ = nullptr; }
 
     /// The `nth` call from now on (1 is the next), and the `times - 1` after it, fail with `error`; an error of 0 makes
-    /// a transfer return 0. A call has one such plan at a time.
+    /// a transfer return 0. Each call has one such plan at a time.
     void fail(Call call, int error, int nth = 1, int times = 1)
     {
         Plan& plan = of(call);
         plan = {plan.calls + nth, plan.calls + nth + times, error, plan.calls};
     }
-    /// The process is killed ahead of its `nth` call that changes something (1 is the next).
+    /// Kills the process before its `nth` call that changes something (1 is the next).
     void killAt(int nth) { changesUntilKilled_ = nth; }
-    /// Every transfer moves at most `bytes` bytes.
+    /// Limits every transfer to `bytes` bytes.
     void limitTransfers(std::size_t bytes) { limit_ = bytes; }
-    /// Calls made since construction, failed ones included.
+    /// Calls since construction, including failed ones.
     int calls(Call call) { return of(call).calls; }
 
 private:

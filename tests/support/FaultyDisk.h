@@ -1,4 +1,4 @@
-// A disk on which one write of an edit fails, or every write from there on: edits cut short at each single call.
+// A disk that fails one write of an edit, or all from there on: edits are cut short at each single call.
 #pragma once
 
 #include "platform/SystemCalls.h"
@@ -10,15 +10,15 @@ enum class Fault {
     none,
     once,
     onceAfterHalf,
-    fromThereOn,   // as if the process had been killed there
+    fromThereOn,   // as if the process had been killed
     fullAfterHalf, // everything but a chunk header fails
-    full           // what the file has is rewritten, and nothing is added to it
+    full           // existing bytes can be rewritten, and nothing can be added
 };
 
-/// Counts the calls that change the file, and lets one of them, or all from there on, fail.
+/// Counts the calls that change the file, and makes one of them, or all from there on, fail.
 struct FaultyDisk {
     static inline int calls;
-    static inline int failing; // the number of the call
+    static inline int failing; // number of the failing call
     static inline Fault fault;
     static inline std::int64_t fullSize;
     static inline platform::SystemCalls real;
@@ -35,9 +35,7 @@ struct FaultyDisk {
         platform::systemCalls().ftruncate = [](int descriptor, std::int64_t length) {
             return fails() ? -1 : real.ftruncate(descriptor, length);
         };
-        platform::systemCalls().fsync = [](int) {
-            return fails() ? -1 : 0;
-        }; // no power is cut here, and a test has no time
+        platform::systemCalls().fsync = [](int) { return fails() ? -1 : 0; }; // tests cut no power and should be quick
     }
 
     static bool fails()
@@ -55,7 +53,7 @@ struct FaultyDisk {
         if (!fails())
             return fault == Fault::full && calls > failing ? writeWhereItIs(descriptor, from, count, position)
                                                            : real.pwrite(descriptor, from, count, position);
-        const bool isHeader = fault == Fault::fullAfterHalf && count <= 12; // the disk has these bytes already
+        const bool isHeader = fault == Fault::fullAfterHalf && count <= 12; // the disk has room for these bytes already
         if (calls - 1 == failing && !isHeader && (fault == Fault::onceAfterHalf || fault == Fault::fullAfterHalf)) {
             real.pwrite(descriptor, from, count / 2, position);
             if (count >= 2)
@@ -64,7 +62,7 @@ struct FaultyDisk {
         return -1;
     }
 
-    /// On a disk without a free block: what lies beyond the end that the file had when the disk became full is lost.
+    /// On a full disk, bytes beyond the file's end at the time when it became full are lost.
     static std::int64_t writeWhereItIs(int descriptor, const void* from, std::size_t count, std::int64_t position)
     {
         platform::FileStatus status;

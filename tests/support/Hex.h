@@ -1,4 +1,4 @@
-// Golden bytes, written and compared as hex.
+// Expected bytes, written and compared as hex.
 #pragma once
 
 #include "platform/core/Bytes.h"
@@ -16,14 +16,14 @@ inline std::string toHex(BytesView bytes)
     return text;
 }
 
-/// Hex digits as `toHex` writes them, without the blanks that group them for the reader.
+/// Hex digits as from `toHex`, without the blanks that group them for readers.
 inline std::string hex(std::string grouped)
 {
     std::erase(grouped, ' ');
     return grouped;
 }
 
-/// Pairs of hex digits, with blanks among them; throws on anything else.
+/// Pairs of hex digits with blanks among them; throws on anything else.
 inline Bytes fromHex(std::string_view grouped)
 {
     const std::string digits = hex(std::string(grouped));

@@ -1,4 +1,4 @@
-// The sound files and documents of examples/media, which tests share with the README.
+// The sound files and documents of examples/media, shared with the README.
 #pragma once
 
 #include <string>

@@ -1,4 +1,4 @@
-// A file that stands in memory.
+// A file in memory.
 #pragma once
 
 #include "media/containers/ByteSource.h"
@@ -9,7 +9,7 @@
 #include <cstring>
 #include <utility>
 
-/// Fails from the read on that goes beyond `readable`.
+/// Reads beyond `readable` fail.
 class MemoryBytes final : public platform::ByteSource {
 public:
     explicit MemoryBytes(Bytes bytes, std::uint64_t readable = UINT64_MAX)

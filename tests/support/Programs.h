@@ -1,4 +1,4 @@
-// Other programs, as independent writers and readers of files.
+// Other programs as independent writers and readers of files.
 #pragma once
 
 #include "support/TemporaryFolder.h"
@@ -6,7 +6,7 @@
 #include <cstdlib>
 #include <string>
 
-/// Runs shell commands in the folder, silently; false when one fails.
+/// Runs shell commands in the folder, silently; false if one fails.
 inline bool runs(const TemporaryFolder& folder, const std::string& command)
 {
     const std::string line = "cd '" + folder.path().string() + "' && { " + command + "; } >/dev/null 2>&1 </dev/null";

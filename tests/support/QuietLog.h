@@ -1,9 +1,9 @@
-// A test that provokes what the library tells its log.
+// Silences the log for tests that provoke messages.
 #pragma once
 
 #include "platform/Log.h"
 
-/// Nothing is logged until it goes out of scope.
+/// Nothing is logged until the end of its scope.
 class QuietLog {
 public:
     QuietLog() : before_(platform::setLogHandler(nullptr)) {}

@@ -1,4 +1,4 @@
-// Files of a test by their paths, as references and as URLs.
+// References and URLs of a test's files by path.
 #pragma once
 
 #include "files/CFileRef.h"

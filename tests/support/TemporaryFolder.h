@@ -1,4 +1,4 @@
-// A folder of its own for a test, removed with all that is in it when the test ends.
+// A folder for a test, removed with its content when the test ends.
 #pragma once
 
 #include "platform/core/Bytes.h"
@@ -9,7 +9,7 @@
 
 class TemporaryFolder {
 public:
-    /// Under `parent`, or under the system's place for temporary files.
+    /// In `parent`, or in the system's place for temporary files.
     explicit TemporaryFolder(const std::filesystem::path& parent = std::filesystem::temp_directory_path());
     ~TemporaryFolder();
     TemporaryFolder(const TemporaryFolder&) = delete;
@@ -26,5 +26,5 @@ private:
     std::filesystem::path path_;
 };
 
-/// The whole content of a file; fails the running test when it cannot be read.
+/// The whole content of a file; fails the running test if it cannot be read.
 Bytes readFile(const std::filesystem::path& path);

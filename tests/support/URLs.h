@@ -1,4 +1,4 @@
-// URLs of a test by their paths, and back.
+// URLs of a test by path, and back.
 #pragma once
 
 #include "platform/URL.h"
@@ -16,7 +16,7 @@ inline platform::URLRef urlOf(const std::string& path, bool isDirectory = false)
                                                    isDirectory);
 }
 
-/// "(null)" for no URL, and one without such a path.
+/// "(null)" for no URL, and for one without such a path.
 inline std::string pathOf(const platform::URLRef& url, platform::PathStyle style = platform::PathStyle::posix)
 {
     const platform::String path = url ? url->copyFileSystemPath(style) : nullptr;

@@ -73,7 +73,7 @@ std::vector<WaveformColumn> foldedColumns(const Waveform& waveform, double from,
     std::vector<WaveformColumn> result(static_cast<std::size_t>(columns));
     for (int i = 0; i < columns; ++i) {
         const double start = from / kFramesOfPoint + pointsPerColumn * i;
-        // A column that ends where a point begins has nothing of it, whatever rounding says.
+        // A column that ends where a point begins contains none of it, despite rounding.
         constexpr double kSlack = 1e-6;
         const std::int64_t first =
             std::clamp(static_cast<std::int64_t>(std::floor(start + kSlack)), std::int64_t{0}, count - 1);

@@ -6,5 +6,5 @@
 
 #include <string>
 
-/// Two small digits for each.
+/// Two lower-case digits per byte.
 KT_EXPORT std::string hexText(BytesView bytes);

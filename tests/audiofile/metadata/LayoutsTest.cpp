@@ -1,5 +1,5 @@
-// Metadata chunks byte by byte: what good ones say, what is made of bad ones, and that writing gives back what was
-// read.
+// Metadata chunks byte by byte: the content of valid ones, the treatment of invalid ones, and that writing restores
+// what was read.
 #include "audiofile/metadata/AIFFInstrumentChunk.h"
 #include "audiofile/metadata/AcidChunk.h"
 #include "audiofile/metadata/AssociatedDataList.h"
@@ -26,7 +26,7 @@ using namespace std::string_view_literals;
 
 namespace {
 
-/// What a kind writes of what it reads; none when it reads nothing.
+/// What a kind writes after reading; none if it reads nothing.
 using Rewrite = std::optional<Bytes> (*)(BytesView);
 
 template <class Chunk, std::endian... order>
@@ -74,7 +74,7 @@ constexpr Kind kKinds[] = {
     {"CAF inst", rewritten<CAFInstrumentChunk>, 28},
 };
 
-/// Bytes in which counts and sizes are small as often as they are nonsense, behind the form of a list.
+/// Bytes whose counts and sizes are often small and often nonsense, after the form of a list.
 Bytes randomBody(std::mt19937& random, std::string_view form, std::size_t shortest)
 {
     Bytes bytes(bytesOf(form).begin(), bytesOf(form).end());
@@ -213,7 +213,7 @@ TEST(MetadataLayouts, ListsOfEveryPadding)
         EXPECT_EQ(toHex(list->write()), hex(bytes));
     }
 
-    // An edit touches what it names; what was cut at the end is whole when something follows.
+    // An edit changes only what it names; an item cut at the end becomes whole if another follows.
     auto list = InfoList::read(fromHex(head + title + title + "49415254 ff000000 61")).value();
     list.set(inam, "new");
     list.set(fourCC("ICMT"), "");
@@ -315,7 +315,7 @@ TEST(MetadataLayouts, BroadcastExtensionOfVersion2)
     EXPECT_EQ(bext.maxShortTermLoudness, -2048);
     EXPECT_EQ(bext.codingHistoryLines(), (std::vector<std::string>{"A=PCM,F=48000", "A=MPEG1L2"}));
 
-    // Of an edit only what it names is written.
+    // An edit writes only what it names.
     EXPECT_FALSE(bext.originator.set(std::string(33, 'x')));
     EXPECT_TRUE(bext.originator.set("somebody"));
     bext.setTimeReference(0x300000004u);

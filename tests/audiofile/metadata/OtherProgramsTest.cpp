@@ -1,4 +1,4 @@
-// Metadata chunks that libsndfile and ffmpeg write, read; and ours, read by libsndfile.
+// Metadata chunks of libsndfile and ffmpeg, read here; and ours, read by libsndfile.
 #include "audiofile/SoundFile.h"
 #include "audiofile/metadata/AIFFInstrumentChunk.h"
 #include "audiofile/metadata/AcidChunk.h"
@@ -19,7 +19,7 @@
 
 namespace {
 
-/// The body of the first chunk of an id in a whole RIFF or FORM file; fails the test when there is none.
+/// The body of the first chunk with an id in a whole RIFF or FORM file; fails the test if there is none.
 Bytes chunkIn(const std::string& path, FourCC id)
 {
     const Bytes bytes = readFile(path);
@@ -37,7 +37,7 @@ Bytes chunkIn(const std::string& path, FourCC id)
     return {};
 }
 
-/// A file of 100 frames of 16 bits that libsndfile writes with a command given ahead of them.
+/// A file of 100 16-bit frames that libsndfile writes after a given command.
 template <class Value>
 std::string soundWith(const TemporaryFolder& folder, int format, int command, Value value)
 {
@@ -60,7 +60,7 @@ struct Chunk {
     Bytes body;
 };
 
-/// A WAVE (little-endian) or AIFF file of 100 frames with chunks ahead of them, opened by libsndfile.
+/// A WAVE (little-endian) or AIFF file of 100 frames with leading chunks, opened by libsndfile.
 SoundFile openedWith(const TemporaryFolder& folder, std::vector<Chunk> chunks, std::endian order = std::endian::little)
 {
     const bool isWAVE = order == std::endian::little;
@@ -195,7 +195,7 @@ TEST(MetadataOfOtherPrograms, LibsndfileReadsOurs)
     ASSERT_EQ(sf_command(aiff.get(), SFC_GET_INSTRUMENT, &instrument, sizeof instrument), SF_TRUE);
     EXPECT_EQ(instrument.basenote, 66);
     EXPECT_EQ(instrument.loops[0].mode, SF_LOOP_FORWARD);
-    char log[4096] = {}; // libsndfile gives out the markers of AIFF in no other way
+    char log[4096] = {}; // the only way to the markers of AIFF in libsndfile
     sf_command(aiff.get(), SFC_GET_LOG_INFO, log, sizeof log);
     EXPECT_NE(std::string(log).find("Mark ID  : 1\n   Position : 10\n   Name     : in\n"
                                     "   Mark ID  : 2\n   Position : 20\n   Name     : \n"),

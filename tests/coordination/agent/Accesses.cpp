@@ -38,7 +38,7 @@ private:
     std::thread thread_;
 };
 
-/// Behaves as told when it is asked by a writer; lets readers through.
+/// Treats writers' requests as told; lets readers through.
 class Presenter : public FilePresenter, public std::enable_shared_from_this<Presenter> {
 public:
     Presenter(std::string name, std::string behaviour, const std::string& path)
@@ -87,7 +87,7 @@ private:
     const std::string name_, behaviour_;
     const URLRef url_;
     OperationQueue queue_{2};
-    std::mutex mutex_; // of `kept_`: the command to answer comes on another thread
+    std::mutex mutex_; // guards `kept_`: the command to answer arrives on another thread
     Reacquirer kept_;
 };
 

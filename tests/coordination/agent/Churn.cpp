@@ -14,8 +14,8 @@ using namespace platform;
 
 namespace {
 
-/// Byte 0: readers share it, writers have it alone. Bytes 1 and 2: shared by readers, and by the locks that only
-/// readers wait for; never both at a time, so each looks for the other's when it has its own.
+/// Byte 0: shared by readers, exclusive for writers. Bytes 1 and 2: shared by readers, and by locks for which only
+/// readers wait; never both at once, so each checks the other's byte while holding its own.
 class Witness {
 public:
     explicit Witness(const std::string& path) : file_(open(path.c_str(), O_RDWR | O_CREAT | O_CLOEXEC, 0600)) {}

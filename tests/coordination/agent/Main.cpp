@@ -21,8 +21,8 @@ void say(const std::string& line)
 
 namespace {
 
-/// Signals, and no restarting of what they interrupt, a thousand times a second; in the threads of accesses alone,
-/// which let them in.
+/// Sends a thousand signals per second, which restart nothing that they interrupt, to the access threads, which unblock
+/// them.
 void startStorm()
 {
     sigset_t alarm;
@@ -37,7 +37,7 @@ void startStorm()
     setitimer(ITIMER_REAL, &often, nullptr);
 }
 
-/// A child that does nothing and lives until its standard input ends, which it shares with this process.
+/// A child that idles until its standard input, which it shares with this process, ends.
 void forkIdleChild()
 {
     const pid_t child = fork();
@@ -74,8 +74,8 @@ std::unique_ptr<Actor> make(const std::string& name, const std::string& verb, st
 
 } // namespace
 
-/// Lines are "folder PATH", "storm", "fork", "limit N", "churn SEED PATH WITNESS", "NAME VERB ARGUMENTS" for what makes
-/// something, and "NAME VERB" for what is done with it.
+/// Lines are "folder PATH", "storm", "fork", "limit N", "churn SEED PATH WITNESS", "NAME VERB ARGUMENTS" to make an
+/// object, and "NAME VERB" to use it.
 int main()
 {
     std::map<std::string, std::unique_ptr<Actor>> actors;
@@ -111,5 +111,5 @@ int main()
     if (churning.joinable())
         churning.join();
     say("end");
-    _exit(0); // whatever still waits
+    _exit(0); // regardless of what still waits
 }

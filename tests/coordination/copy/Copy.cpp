@@ -1,4 +1,4 @@
-// A second copy of the library, loaded into the process that has the first.
+// A second copy of the library, loaded into a process that has one already.
 #include "platform/FileCoordination.h"
 
 using namespace platform;

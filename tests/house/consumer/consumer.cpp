@@ -1,4 +1,4 @@
-// The smallest host: opens an audio file and says what it is.
+// The smallest host: opens an audio file and describes it.
 #include "audiofile/CAudioFileIO.h"
 
 #include <cstdio>

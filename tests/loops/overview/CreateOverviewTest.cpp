@@ -14,7 +14,7 @@
 
 namespace {
 
-// The overview of an image opened as a memory file; empty for none.
+// The overview of an image opened as a memory file; empty if there is none.
 Bytes overviewOf(BytesView image, std::int32_t* status = nullptr)
 {
     MemoryAudioFile file(image, 0);
@@ -88,7 +88,7 @@ TEST_F(CreateOverviewOfFile, AReadThatFailsGivesNothing)
     faults.fail(Call::pread, EIO, 5);
     EXPECT_EQ(file_.CreateOverview({}, &status_), nullptr);
     EXPECT_EQ(status_, kStatusIOError);
-    faults.limitTransfers(1001); // reads that deliver less than was asked for
+    faults.limitTransfers(1001); // reads return less than requested
     const auto block = file_.CreateOverview();
     ASSERT_NE(block, nullptr);
     EXPECT_EQ(pointsOf(*block), Points(OverviewPointCount(1000000), {-32, 32}));
@@ -123,7 +123,7 @@ TEST(CreateOverview, ACodedFileThatEndsEarlyIsDrawnAndOneThatBreaksIsNot)
     EXPECT_EQ(status, kStatusIOError);
 }
 
-// One sound, converted by other programs without a change of its samples.
+// One sound, converted losslessly by other programs.
 TEST(CreateOverview, OneSoundGivesOneOverviewInEveryContainer)
 {
     const TemporaryFolder folder;

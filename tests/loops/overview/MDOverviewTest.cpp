@@ -10,7 +10,7 @@ namespace {
 
 using Samples = std::vector<std::int8_t>;
 
-// The points of 8-bit samples added at once, in a block sized for them.
+// The points of 8-bit samples added at once, in a block of their size.
 Points pointsOfBytes(const Samples& samples, int channels)
 {
     const long frames = static_cast<long>(samples.size()) / channels;
@@ -94,13 +94,13 @@ TEST(MDOverview, WhatIsBeyondTheBlockIsDropped)
     EXPECT_EQ(OverviewFrames(block), 2400u);
     EXPECT_EQ(block.size(), OverviewBlockSize(512));
 
-    // And what is left over of a block is given back.
+    // The unused rest of a block is returned.
     KTMem large(OverviewBlockSize(1000));
     MDOverview early(&large);
     early.Add(samples.data(), 0, 300, 1, 1, 0);
     EXPECT_EQ(early.Finalize()->size(), OverviewBlockSize(300));
 
-    // By slices of 2,048: the second begins beyond.
+    // In slices of 2,048 the second one begins beyond it.
     MDOverview sliced(&block);
     sliced.Add(floats.data(), 0, 5000, 1);
     sliced.Finalize();

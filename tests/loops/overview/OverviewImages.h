@@ -1,5 +1,5 @@
-// What the tests of overviews share: samples of every format, the containers around them, and the plain road that the
-// fast one is held against.
+// Shared by the tests of overviews: samples of every format, containers around them, and the plain road as a reference
+// for the fast one.
 #pragma once
 
 #include "loops/overview/MDOverview.h"
@@ -35,7 +35,7 @@ inline KTMem blockOf(BytesView bytes)
     return block;
 }
 
-/// A block of so many frames with these points.
+/// A block of that many frames with these points.
 inline KTMem blockOf(std::uint32_t frames, std::initializer_list<OverviewPoint> points)
 {
     KTMem block(kOverviewHeaderSize + points.size() * sizeof(OverviewPoint));
@@ -62,7 +62,7 @@ inline std::string nameOf(platform::SampleFormat format)
            (format.order == std::endian::big ? " big" : " little");
 }
 
-/// Samples that reach every value of their format; floats also exceed full scale, and some are no numbers.
+/// Samples with every value of their format; floats include values beyond full scale and NaNs.
 inline Bytes randomSamples(std::mt19937& random, platform::SampleFormat format, std::size_t count)
 {
     Bytes samples(count * static_cast<std::size_t>(format.bytesPerSample()));
@@ -79,7 +79,7 @@ inline Bytes randomSamples(std::mt19937& random, platform::SampleFormat format, 
     return samples;
 }
 
-/// The body of a WAVE "fmt " chunk; floats with their own tag.
+/// The body of a WAVE "fmt " chunk; floats have their own tag.
 inline Bytes waveFormat(platform::SampleFormat format, int channels)
 {
     return waveFormat(format.isFloat ? 3 : 1, channels, 44100, channels * format.bytesPerSample(), format.bits);
@@ -105,7 +105,7 @@ inline Bytes imageOf(platform::SampleFormat format, int channels, BytesView samp
     return ContainerBuilder("caff").chunk("desc", cafDescription(format, channels)).chunk("data", data.view()).bytes();
 }
 
-/// The plain road: every sample becomes a float, then a signed byte, and the bytes are added in the slices of the rule.
+/// The plain road: converts each sample to a float, then to a signed byte, and adds the bytes in the prescribed slices.
 inline void addPlainly(MDOverview& overview, const float* samples, long start, long frames, int channels)
 {
     const platform::SampleFormat bytes{8, false, false, std::endian::native};

@@ -14,7 +14,7 @@ namespace {
 constexpr platform::SampleFormat k16{16, false, false, std::endian::little};
 constexpr std::uint32_t kFrames = 300;
 
-// Files of 300 frames of 16-bit mono, with chunks behind the samples.
+// Files of 300 mono 16-bit frames, with chunks after the samples.
 struct StoredChunk {
     std::string_view id;
     Bytes body;
@@ -44,7 +44,7 @@ Bytes caf(std::initializer_list<StoredChunk> chunks = {}, std::optional<std::int
     return withChunks(ContainerBuilder("caff").format().chunk("data", data, dataSize), chunks);
 }
 
-/// A block, whose header is in the host's order, as it stands in a WAVE file.
+/// A block, whose header is in host order, as a WAVE file stores it.
 std::string inWave(const KTMem& block)
 {
     Bytes bytes = bytesOf(block);
@@ -60,7 +60,7 @@ protected:
         CAudioFileIO file(ref, 0);
         return file.FindChunk(fourCC(id[0], id[1], id[2], id[3])).value_or(Bytes());
     }
-    /// The block; where there is none, the status.
+    /// The block, or the status if there is none.
     std::string read(const CFileRef& ref, long frames = 0)
     {
         std::int32_t status = 1;
@@ -68,7 +68,7 @@ protected:
         EXPECT_TRUE(block == nullptr || (IsOverviewBlock(*block) && status == kStatusOK));
         return block ? inWave(*block) : std::to_string(status);
     }
-    /// "stored" or the status; where it was not stored without an error, "0".
+    /// "stored", or the status; "0" if it was not stored but there was no error.
     std::string write(const CFileRef& ref, KTMem* overview, long frames = 0)
     {
         const Bytes before = overview != nullptr ? bytesOf(*overview) : Bytes();
@@ -135,12 +135,12 @@ TEST_F(StoredOverview, OlderOnesAreReadToo)
     }
     const std::string newer = hex("2c01000000000000 0001 0002"); // goes first
     EXPECT_EQ(read(fileOf(wave({{"LGWV", fromHex(newer)}, {"ovwf", fromHex(ahead + "40fd7f81")}}))), newer);
-    // One that does not fit hides nothing.
+    // An overview that does not fit hides nothing.
     EXPECT_EQ(read(fileOf(wave({{"LGWV", Bytes(11)}, {"ovwf", fromHex(ahead + "40fd7f81")}}))),
               hex("2c01000000000000 fd40817f"));
 }
 
-// CAF pairs of any number of frames, in a file of 300 frames or of as many as the case says.
+// CAF pairs of any number of frames, in a file of 300 frames or as many as the case says.
 TEST_F(StoredOverview, PairsOfOtherLengthsBecomePoints)
 {
     const struct {
@@ -267,7 +267,7 @@ TEST_F(StoredOverview, TheOldOneStaysUntilTheNewOneStands)
     }
 }
 
-// The status is that of the chunk layer, and the file is closed each time.
+// The status is the chunk layer's, and the file is closed each time.
 TEST_F(StoredOverview, FailuresOfTheDiskAreReported)
 {
     const std::string block = inWave(overview_);
@@ -278,7 +278,7 @@ TEST_F(StoredOverview, FailuresOfTheDiskAreReported)
         EXPECT_TRUE(write(ref, &overview_).starts_with('-'));
         faults.fail(Call::pwrite, ENOSPC, 1, 0);
         EXPECT_EQ(write(ref, &overview_), "stored");
-        // Whichever read fails, there is no overview, or it is the one that was stored.
+        // If any read fails, there is no overview or the stored one.
         for (int nth = 1; nth < 6; ++nth) {
             faults.fail(Call::pread, EIO, nth);
             const std::string got = read(ref);

@@ -35,7 +35,7 @@ TEST(ChunkIDs, EveryUUIDMapsBackAndTheRestMapsToNothing)
         EXPECT_EQ(chunkIDToCafChunkUUID(id), nullptr);
 }
 
-// Records are swapped by the count in host order, and none behind them.
+// Swaps as many records as the count in host order, and none beyond.
 TEST(TransientsChunk, IsSwappedAsFarAsItCounts)
 {
     Bytes original(sizeof(tagging::TransientsChunk) + 3 * sizeof(tagging::TransientRecord));

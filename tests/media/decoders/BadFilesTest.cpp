@@ -1,4 +1,4 @@
-// Files that are broken, that are no audio, or that hold something else besides: a status, and not a word on standard
+// Damaged files, files that are no audio, and files with other content besides: a status, and no output on standard
 // error.
 #include "Sounds.h"
 #include "platform/core/Status.h"
@@ -16,7 +16,7 @@ using namespace platform;
 
 namespace {
 
-/// What is written to standard error while it lives, by whatever library.
+/// Captures standard error during its lifetime, from any library.
 class StandardError {
 public:
     explicit StandardError(const TemporaryFolder& folder) : path_(folder / "stderr"), kept_(dup(STDERR_FILENO))
@@ -39,7 +39,7 @@ private:
     int kept_;
 };
 
-/// Opens and reads all of it, some of it twice. True when it opened; frames that are promised must come.
+/// Opens and reads everything, some of it twice. True if it opened; promised frames must be delivered.
 bool readsThrough(const std::string& path)
 {
     std::int32_t status = 1;
@@ -73,7 +73,7 @@ std::size_t openDescriptors()
     return static_cast<std::size_t>(std::distance(begin(all), end(all)));
 }
 
-/// A file whose mutants are read.
+/// A file to derive mutants from.
 struct Original {
     const char* name;
     const char* command;
@@ -113,7 +113,7 @@ TEST_P(Mutants, GiveAStatusOrTheirFrames)
             Bytes mutant = original;
             if (i % 4 == 0)
                 mutant.resize(random() % mutant.size());
-            // Headers lie at the start in some of these, at the end in others.
+            // Headers are at the start of some files and at the end of others.
             const std::size_t near = i % 2 == 0 ? mutant.size() : std::min<std::size_t>(mutant.size(), 400);
             for (unsigned flips = i % 4 == 0 ? 0 : 1 + random() % 8; flips > 0; --flips)
                 mutant[random() % near] ^= static_cast<std::byte>(1 << random() % 8);
@@ -121,7 +121,7 @@ TEST_P(Mutants, GiveAStatusOrTheirFrames)
         }
         said = standardError.text();
     }
-    // FFmpeg says this in nobody's name, so that only the process could keep it back.
+    // FFmpeg logs this without a context, so only the process could suppress it.
     said = std::regex_replace(said, std::regex("Ignoring attempt to set invalid timebase [^\n]*\n"), "");
     EXPECT_EQ(said, "");
     EXPECT_EQ(openDescriptors(), descriptors);
@@ -146,7 +146,7 @@ TEST(BadFiles, WhatIsNoAudioIsNotSupported)
     folder.write("zeros.bin", BytesView(Bytes(100'000)));
     folder.write("empty.flac", "");
     folder.write("text.txt", "What is written here is no sound, whatever it says of sounds.\n");
-    // Names that a player would follow, to files and to networks.
+    // Names of files and networks that a player would follow.
     folder.write("list.m3u8", "#EXTM3U\n#EXT-X-TARGETDURATION:1\n#EXTINF:1,\nsound.flac\n#EXT-X-ENDLIST\n");
     folder.write("list.ffconcat", "ffconcat version 1.0\nfile sound.flac\n");
     folder.write("list.sdp", "v=0\no=- 0 0 IN IP4 127.0.0.1\nc=IN IP4 127.0.0.1\nm=audio 9 RTP/AVP 0\n");
@@ -168,7 +168,7 @@ TEST(BadFiles, WhatIsNoAudioIsNotSupported)
     EXPECT_EQ(said, "");
 }
 
-// The sound of the file after the break is where it was; the gap is silence, and counted.
+// After a break, the sound stays where it was; the gap is silent and counted.
 TEST(BadFiles, ABrokenPacketIsSilenceAndMovesNothing)
 {
     constexpr std::uint32_t frames = 100'000;
@@ -188,7 +188,7 @@ TEST(BadFiles, ABrokenPacketIsSilenceAndMovesNothing)
         EXPECT_EQ(reader->frameCount(), frames) << name;
         const Bytes all = allFramesOf(*reader, 4096);
         ASSERT_EQ(all.size(), whole.size()) << name;
-        // Packets of TTA last a second, pages of Ogg most of one.
+        // Packets of TTA last a second, and most pages of Ogg do.
         const auto head = static_cast<std::ptrdiff_t>(whole.size() / 4);
         const auto tail = static_cast<std::ptrdiff_t>(whole.size() / 112 * 8);
         EXPECT_TRUE(std::equal(all.begin(), all.begin() + head, whole.begin())) << name;
@@ -213,7 +213,7 @@ TEST(BadFiles, ABrokenPacketIsSilenceAndMovesNothing)
     }
 }
 
-// A frame of its own that decodes, in the place of another: only the checksum of all the sound tells.
+// A valid frame in the place of another: only the checksum of the whole sound reveals it.
 TEST(BadFiles, FLACIsComparedWithItsChecksum)
 {
     using Checksum = ConvertingReader::Checksum;
@@ -269,7 +269,7 @@ TEST(BadFiles, AFileThatIsGoneHasAStatus)
     EXPECT_EQ(status, kStatusFileNotFound);
 }
 
-// Two files one behind the other: what the first is decides.
+// Two concatenated files: the first one decides.
 TEST(BadFiles, AChangeOfChannelsMidwayKeepsTheFormat)
 {
     const TemporaryFolder folder;
@@ -298,7 +298,7 @@ TEST(BadFiles, AChangeOfChannelsMidwayKeepsTheFormat)
     }
 }
 
-// A file whose sound is locked, and is named so.
+// A file whose protected sound has its own id.
 TEST(BadFiles, LockedSoundIsNotSupported)
 {
     const TemporaryFolder folder;
@@ -320,7 +320,7 @@ TEST(BadFiles, LockedSoundIsNotSupported)
     }
 }
 
-// It opens, so that callers get to see that its table says so.
+// It opens, so that callers see what its table says.
 TEST(BadFiles, AnMP3WithoutValidFramesOpensAndHasNone)
 {
     const TemporaryFolder folder;
@@ -343,7 +343,7 @@ TEST(BadFiles, AnMP3WithoutValidFramesOpensAndHasNone)
 
 namespace {
 
-/// The checksum of an Ogg page, the field of which is 0.
+/// Checksum of an Ogg page whose checksum field is 0.
 std::uint32_t oggChecksum(BytesView page)
 {
     std::uint32_t sum = 0;
@@ -357,7 +357,7 @@ std::uint32_t oggChecksum(BytesView page)
 
 } // namespace
 
-// Pages that are whole, but whose times no file can have.
+// Intact pages with impossible times.
 TEST(BadFiles, TimesBeyondReasonAreNone)
 {
     const TemporaryFolder folder;

@@ -1,4 +1,4 @@
-// What the ends of a file prove is what decoding gives, whatever happened to the file; else nothing is told.
+// What a file's ends prove is what decoding gives, whatever happened to the file; otherwise they report nothing.
 #include "Sounds.h"
 #include "media/decoding/CompressedAudio.h"
 #include "media/packets/HighFirstCRC.h"
@@ -42,7 +42,7 @@ void PrintTo(const Making& making, std::ostream* out)
     *out << making.command;
 }
 
-/// True when the ends tell what decoding does, false when they tell nothing.
+/// True if the ends agree with decoding, false if they report nothing.
 bool isProven(const std::string& path, FourCC type)
 {
     CompressedAudio byEnds, byDecoding;
@@ -58,7 +58,7 @@ bool isProven(const std::string& path, FourCC type)
 
 class FileEnds : public ::testing::TestWithParam<Making> {
 protected:
-    /// The path of the sound, coded; empty when the coding has no such sound.
+    /// The path of the encoded sound; empty if the coding does not support it.
     std::string made(std::uint32_t frames, std::uint32_t channels, double rate, int bits)
     {
         writeSound(folder_ / "IN.wav", frames, channels, rate, bits);
@@ -77,7 +77,7 @@ TEST_P(FileEnds, proveWhatDecodingGives)
 {
     const FourCC type = GetParam().type;
     int proven = 0;
-    // The last is as long as a packet or less.
+    // The last packet is full or shorter.
     const std::tuple<std::uint32_t, std::uint32_t, double, int> sounds[] = {
         {220501, 2, 44100, 16}, {40000, 1, 16000, 16}, {50003, 6, 48000, 24}, {700, 2, 44100, 16}};
     for (const auto& [frames, channels, rate, bits] : sounds) {
@@ -115,7 +115,7 @@ TEST_P(FileEnds, proveNothingElseOfVariants)
         proven += isProven(folder_.write("mutant", mutant), type) ? 1 : 0;
     }
     EXPECT_GT(proven, 0); // damaged where nothing depends on it
-    // More behind; the same again; some of it missing, and twice.
+    // Data appended, the same file appended, a part removed, a part repeated.
     const auto part = [&](double from, double to) {
         const auto at = [&](double place) {
             return content.begin() + static_cast<std::ptrdiff_t>(place * static_cast<double>(content.size()));
@@ -176,7 +176,7 @@ TEST(FileEndsOfOgg, areInDoubtWhereThereAreSeveralStreams)
     EXPECT_FALSE(isProven(folder / "two.ogg", fourCC("ogg ")));
 }
 
-// FLAC has checksums of its own, and no decoder cuts its last frame.
+// FLAC has its own checksums, and decoders do not cut its last frame.
 TEST(FileEndsOfOgg, areInDoubtWhereAPageIsRightAndItsContentIsNot)
 {
     const TemporaryFolder folder;
@@ -226,7 +226,7 @@ TEST(FileEndsOfTTA, standBetweenTags)
     EXPECT_TRUE(isProven(folder / "tagged.tta", fourCC("tta ")));
 }
 
-// As decoders have it, which look for a second frame that is like the first.
+// Like decoders, which search for a second frame that resembles the first.
 TEST(FileEndsOfLayerII, areInDoubtWhereTheFirstFramesDiffer)
 {
     const TemporaryFolder folder;

@@ -1,5 +1,5 @@
-// Every format, made by other programs: as many frames as went in, each where it was, and after any seek those of a
-// decode from the start.
+// Every format, encoded by other programs: the number of frames is preserved, each is in its place, and seeks give the
+// frames of a decode from the start.
 #include "Sounds.h"
 #include "media/userdata/AudioFileService.h"
 
@@ -13,23 +13,23 @@ using namespace platform;
 
 namespace {
 
-/// How near a frame after a seek is to that of a decode from the start.
+/// How close a frame after a seek is to that of a decode from the start.
 constexpr float kExact = 0;
-/// Opus settles, but its decoder never wholly forgets; AC-3 fills bands with noise that runs on.
+/// Opus converges, but its decoder never forgets completely; AC-3 fills bands with noise that runs on.
 constexpr float kSettled = 1e-5F, kNoisy = 0.05F;
 
 enum class Length {
     kept,    // as many frames as went in
-    whole,   // packets are whole, and nothing tells where the sound ends
-    encoder, // the encoder's delay is part of it, and nothing tells how long that is; the end may be missing
+    whole,   // packets are whole; nothing tells where the sound ends
+    encoder, // includes the encoder's delay of unknown length; the end may be missing
 };
 
 struct Format {
     const char* name;    // of the file
-    const char* command; // makes it of "source.wav"
+    const char* command; // makes it from "source.wav"
     FourCC formatId;
     FourCC fileType;
-    std::uint32_t bits = 0; // of the source, when the coding is lossless; then every bit comes back
+    std::uint32_t bits = 0; // of the source if the coding is lossless, so that every bit returns
     Length length = Length::kept;
     float tolerance = kExact;
     std::uint32_t channels = 2;
@@ -41,13 +41,13 @@ std::ostream& operator<<(std::ostream& out, const Format& format)
     return out << format.name;
 }
 
-constexpr std::uint32_t kFrames = 300'001; // no multiple of any packet
+constexpr std::uint32_t kFrames = 300'001; // no multiple of a packet
 
 const Format formats[] = {
     {"cbr.mp3", "lame --quiet -b 128 source.wav cbr.mp3", fourCC(".mp3"), fourCC("MPG3")},
     {"vbr.mp3", "lame --quiet -V 2 source.wav vbr.mp3", fourCC(".mp3"), fourCC("MPG3")},
     {"320.mp3", "lame --quiet -b 320 source.wav 320.mp3", fourCC(".mp3"), fourCC("MPG3")},
-    // A tag that tells of the delay does not fit into frames so small.
+    // A tag with the delay does not fit into frames this small.
     {"low.mp3", "lame --quiet -b 32 -m m --resample 24 source.wav low.mp3", fourCC(".mp3"), fourCC("MPG3"), 0,
      Length::encoder, kExact, 1, 24000},
     {"aac.m4a", "ffmpeg -i source.wav -c:a aac -aac_pns 0 aac.m4a", fourCC("aac "), fourCC("m4af")},
@@ -56,7 +56,7 @@ const Format formats[] = {
     {"aac.mp4",
      "ffmpeg -i source.wav -f lavfi -i testsrc=size=64x48:rate=5 -shortest -c:v mpeg4 -c:a aac -aac_pns 0 aac.mp4",
      fourCC("aac "), fourCC("mp4f")},
-    // Its times jump by a frame now and then, as copying leaves them; its frames do not.
+    // Its times jump by a frame now and then, as after copying; its frames do not.
     {"copied.m4a",
      "ffmpeg -i source.wav -t 2.27 -c:a aac -aac_pns 0 a.m4a && ffmpeg -stream_loop 2 -i a.m4a -c copy copied.m4a",
      fourCC("aac "), fourCC("m4af"), 0, Length::encoder},
@@ -148,7 +148,7 @@ void expectNear(const Bytes& found, BytesView expected, float tolerance, std::ui
     EXPECT_LE(worst, tolerance) << "from frame " << frame;
 }
 
-/// How far `found` is from `expected` moved by `lag` frames; of the first channel, in the middle.
+/// Distance of `found`, shifted by `lag` frames, from `expected`; first channel, in the middle.
 double distance(const std::vector<float>& found, const std::vector<float>& expected, int lag, std::uint32_t channels)
 {
     double sum = 0;
@@ -236,7 +236,7 @@ TEST_P(Formats, GivesAfterASeekWhatADecodeFromTheStartGives)
     for (const std::uint64_t frame :
          {std::uint64_t{0}, count - 1, std::uint64_t{1}, count / 2, count / 2 + 5000, count / 2 + 4000})
         expectAt(*reader_, frame, 2500);
-    // In a newly opened file, the first that is done is a seek.
+    // The first operation on a newly opened file is a seek.
     const auto fresh = openReader(folder_ / format.name);
     ASSERT_TRUE(fresh);
     expectAt(*fresh, count - 7000, 100);
@@ -244,7 +244,7 @@ TEST_P(Formats, GivesAfterASeekWhatADecodeFromTheStartGives)
 
 INSTANTIATE_TEST_SUITE_P(All, Formats, testing::ValuesIn(formats), testIdentifier);
 
-// Of files of one page FFmpeg counts the first packet, which gives no frames, and cuts as many off the end.
+// In files of one page FFmpeg counts the first packet, which yields no frames, and cuts that many off the end.
 TEST(ShortFiles, VorbisOfOnePageKeepsItsEnd)
 {
     const TemporaryFolder folder;

@@ -1,5 +1,5 @@
-// What the programs of a coding's makers decode, of files by the encoders that people use: as many frames, the same
-// samples, channels in the same order, and after a seek those of a decode from the start.
+// Comparison with the decoders of the codings' authors, on files of common encoders: the same number of frames, the
+// same samples, the same channel order, and after a seek the frames of a decode from the start.
 #include "Sounds.h"
 
 #include <gtest/gtest.h>
@@ -13,9 +13,9 @@ using namespace platform;
 
 namespace {
 
-/// Files hold the same bits; decoders of floats round; judges write 16 or 24 bits.
+/// Lossless files hold the same bits; decoders of floats round; judges write 16 or 24 bits.
 constexpr float kSame = 0, kRounded = 1e-5F, k16Bits = 1.01F / 32768;
-/// Opus settles after a seek, but its decoder never wholly forgets.
+/// Opus converges after a seek, but its decoder never forgets completely.
 constexpr float kSettledAfterSeek = 1e-5F;
 
 struct Case {
@@ -54,7 +54,7 @@ const Case cases[] = {
     {"VorbisManaged", "oggenc -Q -b 96 --managed source.wav -o a.ogg", kOgg, kOggDec, k16Bits},
     {"Vorbis8kMono", "oggenc -Q -q3 source.wav -o a.ogg", kOgg, kOggDec, k16Bits, 8000, 1},
     {"Vorbis96k", "oggenc -Q -q5 source.wav -o a.ogg", kOgg, kOggDec, k16Bits, 96000, 2, 24},
-    // oggdec puts the low frequencies between the rear channels.
+    // oggdec places the low frequencies between the rear channels.
     {"VorbisSurround", "oggenc -Q -q5 source.wav -o a.ogg", kOgg,
      "oggdec -Q a.ogg -o o.wav && sox -D o.wav judged.wav remix 1 2 3 5 6 4", k16Bits, 48000, 6},
     {"OpusLow", "opusenc --quiet --bitrate 32 source.wav a.opus", kOpus, kOpusDec, kSame, 48000, 2, 16,
@@ -103,7 +103,7 @@ const Case cases[] = {
     {"AU8", "sox -D source.wav -b 8 a.au", "a.au", "sox -D a.au judged.wav", kSame, 8000, 1},
     {"AU24", "sox source.wav a.au", "a.au", "cp source.wav judged.wav", kSame, 96000, 2, 24},
     {"AUFloat", "sox source.wav -e float a.au", "a.au", "sox a.au judged.wav", kSame, 44100, 2, 24},
-    // At lower qualities noise stands for noise, and no two decoders make the same.
+    // At lower qualities decoders substitute noise, which differs between them.
     {"Musepack", "sox -D source.wav s.wav && mpcenc --standard s.wav a.mpc", "a.mpc", "mpcdec a.mpc judged.wav",
      2 * k16Bits},
     {"MusepackTagged",
@@ -134,7 +134,7 @@ float worst(const std::vector<float>& found, const std::vector<float>& expected)
 {
     float worst = 0;
     for (std::size_t i = 0; i < std::min(found.size(), expected.size()); ++i)
-        // What the judge clips is clipped.
+        // Compares as if clipped where the judge clips.
         worst = std::max(worst, std::abs(std::clamp(found[i], -1.0F, 1.0F) - std::clamp(expected[i], -1.0F, 1.0F)));
     return worst;
 }
@@ -197,8 +197,8 @@ std::uint32_t checksum(BytesView bytes, int bits, std::uint32_t polynomial)
     return sum & ((1u << bits) - 1);
 }
 
-/// A FLAC file (RFC 9639) of mono 16-bit samples, not packed, each block of another size, which encoders may write and
-/// hardly one does.
+/// A FLAC file (RFC 9639) of unpacked mono 16-bit samples whose blocks all differ in size, which encoders may write but
+/// rarely do.
 Bytes flacOfChangingBlocks(const std::vector<std::int16_t>& samples)
 {
     Bytes file;
@@ -223,7 +223,7 @@ Bytes flacOfChangingBlocks(const std::vector<std::int16_t>& samples)
             append(frame, 0xF0808080 | (at >> 18) << 24 | (at >> 12 & 63) << 16 | (at >> 6 & 63) << 8 | (at & 63), 4);
         append(frame, count - 1, 2);
         append(frame, checksum(frame, 8, 0x07), 1);
-        append(frame, 2, 1); // as they are
+        append(frame, 2, 1); // verbatim
         for (const std::size_t end = at + count; at < end; ++at)
             append(frame, static_cast<std::uint16_t>(samples[at]), 2);
         append(frame, checksum(frame, 16, 0x8005), 2);

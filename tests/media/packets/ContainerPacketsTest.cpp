@@ -1,4 +1,4 @@
-// Containers that list their packets: MP4, MOV and CAF, as programs write them and with what is changed in them.
+// Containers that list their packets: MP4, MOV and CAF, as programs write them and with modifications.
 #include "media/packets/EncodedFiles.h"
 
 #include "platform/core/ByteWriter.h"
@@ -24,7 +24,7 @@ std::string aacInMP4()
     return encoded("ffmpeg -y -i IN -c:a aac -movflags +faststart OUT", "m4a", kSound);
 }
 
-/// Where the body of the box of that type begins: the type occurs once in the files that are changed here.
+/// Position of the body of the box of that type, which occurs once in these files.
 std::size_t bodyOf(const Bytes& file, std::string_view type)
 {
     const std::size_t at = textOf(file).find(type);
@@ -52,8 +52,7 @@ Bytes box(std::string_view type, BytesView body)
     return out.take();
 }
 
-/// Puts a gapless item into the movie box, which must be the file's last, in place of its other tags, and mostly of its
-/// edits.
+/// Puts a gapless item into the movie box, the last one in the file, in place of its other tags and most of its edits.
 void addGaplessItem(Bytes& file, std::string_view value, std::string_view name = "exampleSMPB", bool keepsEdits = false)
 {
     const auto field = [](std::string_view type, std::size_t zeros, std::string_view content) {
@@ -129,7 +128,7 @@ Bytes packetTable(std::int64_t packets, std::int64_t valid, std::int32_t priming
     return out.take();
 }
 
-/// The packets of the AAC file, as a CAF file holds them.
+/// The packets of the AAC file as a CAF file.
 CAF cafOf(PacketSource& source)
 {
     CAF caf;
@@ -152,10 +151,10 @@ long peakMemory()
 
 } // namespace
 
-// Offsets are those of a box's fields: ISO/IEC 14496-12.
+// Offsets are those of a box's fields (ISO/IEC 14496-12).
 TEST(ContainerPackets, ofMP4AreTakenOnlyWhenTheyAreCountedExactly)
 {
-    // 21 packets of 1,024 frames, of which 2,112 are priming and 192 fill the last one.
+    // 21 packets of 1,024 frames: 2,112 frames are priming and 192 fill the last one.
     constexpr std::string_view fitting = " 00000000 00000840 000000C0 0000000000004B00 00000000 00000000";
     const struct {
         const char* name;
@@ -211,7 +210,7 @@ TEST(ContainerPackets, ofMP4AreTakenOnlyWhenTheyAreCountedExactly)
     }
 }
 
-// The forms of boxes that programs write for files beyond 4 GiB.
+// Box forms for files beyond 4 GiB.
 TEST(ContainerPackets, ofMP4AreFoundByBoxesOfOtherWidths)
 {
     const std::string path = encoded("ffmpeg -y -i IN -c:a aac OUT", "m4a", kSound);
@@ -262,7 +261,7 @@ TEST(ContainerPackets, ofMP4AreFoundByBoxesOfOtherWidths)
     }
 }
 
-// "stz2": sizes of packets in 4, 8 or 16 bits each, where "stsz" has 32.
+// "stz2" has packet sizes of 4, 8 or 16 bits, where "stsz" has 32.
 TEST(ContainerPackets, ofMP4HaveSizesInFewerBits)
 {
     const TemporaryFolder folder;
@@ -314,7 +313,7 @@ TEST(ContainerPackets, ofCAF)
     const CAF sound = cafOf(*source);
     const Bytes movie = readFile(aacInMP4());
     const auto descriptor = movie.begin() + static_cast<std::ptrdiff_t>(bodyOf(movie, "esds")) + 4;
-    // With these flags (ISO/IEC 14496-1: ES_Descriptor), and so many bytes for what they announce; the address has 3.
+    // With these flags (ISO/IEC 14496-1: ES_Descriptor) and that many bytes for what they announce; the address has 3.
     const auto fullDescriptor = [&](std::uint8_t flags, std::size_t more) {
         Bytes cookie(descriptor, descriptor + 42);
         cookie[4] = static_cast<std::byte>(std::to_integer<std::size_t>(cookie[4]) + more); // its size, of 4 bytes

@@ -16,7 +16,7 @@ const TemporaryFolder& folder()
     return made;
 }
 
-/// Noise without its highest frequencies, as a WAVE file.
+/// Noise without the highest frequencies, as a WAVE file.
 std::string waveOf(const Sound& sound)
 {
     const std::string name =

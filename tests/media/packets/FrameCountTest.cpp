@@ -1,4 +1,4 @@
-// The frames that the tables call sound are those that went into the encoder.
+// The frames that the tables call sound are those that the encoder received.
 #include "media/packets/EncodedFiles.h"
 
 #include <gtest/gtest.h>
@@ -17,7 +17,7 @@ struct Coding {
 constexpr Coding kLAME{"lame --quiet IN OUT", "mp3", fourCC("MPG3"), fourCC(".mp3"), 1152};
 constexpr Coding kAACInMP4{"ffmpeg -y -i IN -c:a aac OUT", "m4a", fourCC("m4af"), fourCC("aac "), 1024};
 
-// Each states what it codes, to the frame.
+// These state the number of frames exactly.
 constexpr Coding kExact[] = {
     kLAME,
     {"lame --quiet -V4 IN OUT", "mp3", fourCC("MPG3"), fourCC(".mp3"), 1152},

@@ -1,4 +1,4 @@
-// Streams of frames without a table, built by hand: what stands around the frames, and what is broken between them.
+// Hand-made streams of frames without a table: foreign bytes around the frames, and damage between them.
 #include "media/packets/EncodedFiles.h"
 
 #include "platform/core/Packed.h"
@@ -11,7 +11,7 @@ using namespace platform;
 
 namespace {
 
-/// Frame `number` of MPEG-1 layer III: 44.1 kHz, stereo, 417 bytes at 128 kbit/s, unless the header says otherwise.
+/// Frame `number` of MPEG-1 layer III: 44.1 kHz, stereo, 417 bytes at 128 kbit/s unless the header says otherwise.
 Bytes frame(std::uint32_t number, std::uint32_t header = 0xFFFB9064, std::size_t size = 417)
 {
     Bytes bytes(size, std::byte{0x55});
@@ -21,13 +21,13 @@ Bytes frame(std::uint32_t number, std::uint32_t header = 0xFFFB9064, std::size_t
     return bytes;
 }
 
-/// As frame(), of 261 bytes at 80 kbit/s: where every frame was as long as the first, much would be lost.
+/// As frame(), with 261 bytes at 80 kbit/s: assuming one length for all frames would lose many.
 Bytes shortFrame(std::uint32_t number)
 {
     return frame(number, 0xFFFB6064, 261);
 }
 
-/// A frame of ADTS: AAC-LC, 44.1 kHz, stereo, of `size` bytes with its header of 7.
+/// An ADTS frame: AAC-LC, 44.1 kHz, stereo, `size` bytes including its header of 7.
 Bytes adtsFrame(std::uint32_t number, std::uint32_t size = 200)
 {
     Bytes bytes(size, std::byte{0x55});
@@ -59,7 +59,7 @@ Bytes text(std::string_view content)
     return {bytesOf(content).begin(), bytesOf(content).end()};
 }
 
-/// An ID3v2 tag of 10 + `size` bytes, filled with what looks like headers.
+/// An ID3v2 tag of 10 + `size` bytes, filled with apparent headers.
 Bytes leadingTag(std::uint32_t size)
 {
     Bytes tag(10 + size, std::byte{0xFF});
@@ -69,7 +69,7 @@ Bytes leadingTag(std::uint32_t size)
     return tag;
 }
 
-/// An APE tag of `size` bytes behind its header, if it has one, with these flags in the footer.
+/// An APE tag of `size` bytes after its header, if it has one, with these flags in the footer.
 Bytes trailingTag(std::uint32_t size, std::uint32_t flags, std::string_view id = "APETAGEX")
 {
     Bytes tag(size + (flags >> 31) * 32, std::byte{0xFF});
@@ -82,7 +82,7 @@ Bytes trailingTag(std::uint32_t size, std::uint32_t flags, std::string_view id =
     return tag;
 }
 
-/// A frame that tells of the others: "Xing", frames and bytes, then LAME's own fields with the two numbers of padding.
+/// A frame that describes the others: "Xing", frames and bytes, then LAME's fields with both numbers of padding.
 Bytes infoFrame(std::uint32_t frameCount, std::uint32_t byteCount, std::uint32_t padding = 576 << 12 | 1000)
 {
     Bytes bytes(417);
@@ -198,7 +198,7 @@ TEST(FramesInAStream, theHeadersCountIsTakenWhenItAgreesWithTheFile)
     }
 }
 
-// What a frame's samples need may stand 511 bytes back, in MPEG-2 255.
+// The bits of a frame may begin 511 bytes back, in MPEG-2 255.
 TEST(FramesInAStream, asManyPacketsAreDecodedAheadAsTheReservoirReaches)
 {
     const struct {

@@ -1,4 +1,4 @@
-// Broken files of every kind: each is refused, or has a table that its packets bear out.
+// Damaged files of every kind: each is refused, or has a table that its packets confirm.
 #include "media/packets/EncodedFiles.h"
 
 #include <gtest/gtest.h>
@@ -9,7 +9,7 @@ using namespace platform;
 
 namespace {
 
-/// Whether it opens.
+/// Whether the file opens.
 bool expectSound(const std::string& path, std::size_t fileSize)
 {
     std::int32_t status = 0;
@@ -24,7 +24,7 @@ bool expectSound(const std::string& path, std::size_t fileSize)
     EXPECT_GE(table.remainderFrames, 0);
     EXPECT_LE(source->packetCount(), fileSize);
     Bytes packet;
-    for (std::uint64_t i = source->packetCount(); i-- > 0;) { // backwards, as no reader goes
+    for (std::uint64_t i = source->packetCount(); i-- > 0;) { // backwards, unlike any reader
         EXPECT_LE(source->preRoll(i), i);
         if (source->read(i, packet) == 0) {
             EXPECT_LE(packet.size(), fileSize);
@@ -47,7 +47,7 @@ TEST(Mutants, areRefusedOrSound)
         {"ffmpeg -y -i IN -c:a alac OUT", "caf"},
         {"ffmpeg -y -i IN -c:a libmp3lame OUT", "caf"},
     };
-    constexpr int kMutants = 300; // a half of them broken, a half cut
+    constexpr int kMutants = 300; // half of them damaged, half cut
     const TemporaryFolder folder;
     std::minstd_rand random(20);
     const auto below = [&](std::size_t end) { return std::uniform_int_distribution<std::size_t>(0, end - 1)(random); };
@@ -55,7 +55,7 @@ TEST(Mutants, areRefusedOrSound)
         SCOPED_TRACE(std::string(command) + " " + extension);
         const Bytes original = readFile(encoded(command, extension, {.frames = 20000}));
         ASSERT_FALSE(original.empty());
-        // Where headers and tables are, more is to be broken than in the packets.
+        // There is more to damage in headers and tables than in packets.
         const std::size_t head = std::min<std::size_t>(original.size(), 1500);
         int opening = 0;
         for (int i = 0; i < kMutants && !::testing::Test::HasFailure(); ++i) {
@@ -73,6 +73,6 @@ TEST(Mutants, areRefusedOrSound)
             SCOPED_TRACE(i);
             opening += expectSound(folder.write("mutant", mutant), mutant.size());
         }
-        EXPECT_GT(opening, 10); // else nothing but refusals was tested
+        EXPECT_GT(opening, 10); // otherwise only refusals were tested
     }
 }

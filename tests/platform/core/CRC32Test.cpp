@@ -7,7 +7,7 @@
 
 namespace {
 
-/// The definition: one bit at a time.
+/// The definition, bit by bit.
 std::uint32_t bitwiseCRC32(std::uint32_t previous, const unsigned char* bytes, std::size_t count)
 {
     std::uint32_t crc = ~previous;

@@ -7,7 +7,7 @@
 #include <limits>
 #include <new>
 
-// Under a sanitizer an allocation that is too large must fail as it does without.
+// Makes an oversized allocation fail under a sanitizer as it does without.
 extern "C" const char* __asan_default_options();
 extern "C" const char* __asan_default_options()
 {
@@ -33,7 +33,7 @@ TEST(KTMem, GrowingKeepsTheContentAndFillsWithZeros)
     KTMem block(10);
     EXPECT_TRUE(isZero(block, 0));
     std::memset(block.data(), 7, 10);
-    // Shrunk bytes must not shine through when the block grows again inside its capacity.
+    // Bytes that were cut off must not reappear when the block grows within its capacity.
     ASSERT_TRUE(block.reallocate(6));
     ASSERT_TRUE(block.reallocate(9));
     EXPECT_EQ(block.size(), 9U);

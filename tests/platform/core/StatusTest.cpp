@@ -42,7 +42,7 @@ TEST(Status, AnApplicationErrorStandsForTheOneBelowIt)
     const auto application = error(platform::ErrorDomain::application, 5, system);
     EXPECT_EQ(NSErrorToOSErr(application.get()), -34);
     EXPECT_EQ(NSErrorToOSErr(error(platform::ErrorDomain::application, 5).get()), -1);
-    // One level only; and the error below another domain is not asked.
+    // One level only; an error below another domain is ignored.
     EXPECT_EQ(NSErrorToOSErr(error(platform::ErrorDomain::application, 5, application).get()), -1);
     EXPECT_EQ(NSErrorToOSErr(error("elsewhere", 5, status).get()), -1);
 }

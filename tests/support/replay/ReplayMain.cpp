@@ -1,4 +1,4 @@
-// Replays the seeds of a fuzz target: replay_NAME FOLDER. Fails when there is none.
+// Replays the seeds of a fuzz target: replay_NAME FOLDER. Fails if there are none.
 #include <cstdint>
 #include <cstdio>
 #include <filesystem>

@@ -1,4 +1,4 @@
-// What is off in an open audio file.
+// What is wrong with an open audio file.
 #pragma once
 
 #include "media/containers/ContainerCheck.h"
@@ -8,13 +8,13 @@
 class CAudioFileIO;
 class CFileIO;
 
-/// As platform::checkContainer, which says what is found and returned; kStatusParameterError also for a file that is
-/// compressed throughout, of which AudioFileInfo::IsWhole() tells.
+/// As platform::checkContainer, with its findings and results. kStatusParameterError also for a file that is
+/// compressed throughout; AudioFileInfo::IsWhole() judges those.
 KT_EXPORT std::int32_t CheckAudioFile(CFileIO& file, std::vector<platform::ContainerFinding>& findings);
 
-/// Compares the sample bytes of an open WAVE file with the MD5 that its chunk "MD5 " states of them, as programs for
-/// broadcast wave files embed it: 16 bytes, the digest as a number of 128 bits, little-endian; in the order in which
-/// the digest is written, too, which other programs take. Reads all samples where there is such a chunk and nothing of
-/// them is missing, and none otherwise. `goesOn` as in DigestAudio. 0; the status of a read that failed.
+/// Compares the sample bytes of an open WAVE file with the MD5 in its chunk "MD5 ", which programs for broadcast wave
+/// files embed: 16 bytes, the digest as a little-endian 128-bit number, or in the order in which a digest is written,
+/// as other programs have it. Reads all samples when there is such a chunk and none of them is missing, and nothing
+/// otherwise. `goesOn` as in DigestAudio. 0, or the status of a failed read.
 KT_EXPORT std::int32_t CheckStatedDigest(CAudioFileIO& file, std::vector<platform::ContainerFinding>& findings,
                                          const std::function<bool()>& goesOn = {});

@@ -9,20 +9,20 @@
 #include <cstddef>
 #include <cstdint>
 
-/// Room that a buffer for BuildAudioFileHeader needs.
+/// The size of a buffer for BuildAudioFileHeader, in bytes.
 inline constexpr std::size_t kMaxAudioFileHeaderSize = 4096;
 
-/// Writes the complete header of a file whose sample data follows it and returns its length in bytes; 0 when it builds
-/// nothing: an unknown type, a format that the type cannot hold, more frames than its size fields can say.
+/// Writes the complete header of a file whose samples follow it, and returns its length in bytes. 0, and nothing
+/// written, for an unknown type, a format that the type cannot hold, and more frames than its size fields can state.
 /// `fileType` is "WAVE" (little-endian; 8 bits unsigned), "AIFF" (big-endian; floats as AIFC), or "caff"
-/// (little-endian). `bits` is 8, 16, 24, 32 or 64, -32 for 32-bit floats; 64 means floats. `channels` of 0 stands for
-/// those of `busFormat`; with more than two of them, WAVE and CAF files name the bus format's speakers. WAVE is
-/// extensible for more than 16 bits or two channels. `option` reserves room ("JUNK") in a WAVE file to grow past 4 GiB,
-/// and makes it RF64 once it has.
+/// (little-endian). `bits` is 8, 16, 24, 32 or 64, -32 for 32-bit floats; 64 means floats. `channels` of 0 means as
+/// many as `busFormat` has; for more than two channels, WAVE and CAF files name the bus format's speakers. WAVE is
+/// extensible for more than 16 bits or two channels. `option` reserves room ("JUNK") for a WAVE file to grow past 4
+/// GiB, and makes it RF64 once it has.
 KT_EXPORT long BuildAudioFileHeader(void* buffer, FourCC fileType, long long frames, long long sampleRate, int channels,
                                     int bits, TAudioBusFormat busFormat, bool option);
 
-/// The same header, of any length, with further chunks ahead of the samples: `chunks` are whole, with headers and pad
-/// bytes. Empty where BuildAudioFileHeader gives 0.
+/// The same header, of any length, with further chunks ahead of the samples: whole ones, with headers and pad bytes.
+/// Empty where BuildAudioFileHeader returns 0.
 KT_EXPORT Bytes MakeAudioFileHeader(FourCC fileType, long long frames, long long sampleRate, int channels, int bits,
                                     TAudioBusFormat busFormat, bool option, Bytes chunks);

@@ -29,21 +29,22 @@ enum TAudioBusFormat : int {
     kAudioBus9_1_4 = 14,
 };
 
+/// What an audio file is: its container, its format, its length, its loop.
 struct KT_EXPORT AudioFileInfo {
     FourCC fileType = 0;             // "WAVE", "AIFF" (AIFC too), "caff", "REX2"; "MPG3", "adts", "M4A ", "mpg4",
                                      // "flac" and others that are compressed throughout; 0 when unknown
     std::int64_t sampleRate = 44100; // frames per second, rounded
     std::int32_t bitsPerSample = 16; // of a sample's container: 24 for 20 bits in 3 bytes; 0 for compressed data
-    std::int32_t channels = 1;
-    bool byteSwapped = false; // samples in the other byte order than the host's
-    bool floatingPoint = false;
-    std::int64_t dataOffset = 0; // of the first sample byte; 0 when there is none
-    std::int64_t frames = 0;
-    std::int64_t fileLength = 0;
+    std::int32_t channels = 1;       // interleaved in each frame
+    bool byteSwapped = false;        // samples in the other byte order than the host's
+    bool floatingPoint = false;      // samples are floats
+    std::int64_t dataOffset = 0;     // of the first sample byte; 0 when there is none
+    std::int64_t frames = 0;         // samples of each channel; 0 when unknown
+    std::int64_t fileLength = 0;     // of the file, in bytes
 
-    // The loop, as the basic tagging chunk of an AIFF or CAF file tells of it.
-    float beatCount = 0;         // 0: the file carries none
-    std::int32_t timingFlag = 0; // 1: the file has the chunk, so that the timing is known, also that there is none
+    // The loop, from the basic tagging chunk of an AIFF or CAF file.
+    float beatCount = 0;         // 0: none in the file
+    std::int32_t timingFlag = 0; // 1: the file has the chunk, so that its timing, or that it has none, is known
     std::int64_t loopCount = 0;  // 1: the file is a loop
     float loopValue = 0;         // tempo in beats per minute; 0 without beats, frames or a sample rate
 
@@ -52,35 +53,36 @@ struct KT_EXPORT AudioFileInfo {
     FourCC formType = 0;    // "WAVE", "AIFF", "AIFC", "REX2"; 0 for CAF
     FourCC formatCode = 0;  // "lpcm" for linear PCM; AIFC compression type, CAF format id, WAVE tag as "ms\hh\ll";
                             // ".mp3", "aac ", "alac", "flac", … elsewhere
-    double exactSampleRate = 44100;
+    double exactSampleRate = 44100;      // in Hz, with its fraction
     platform::SampleFormat sampleFormat; // of linear PCM
     bool compressed = false;             // frames come from a decoder, if at all; so do integers of 64 bits
     bool framesAreStated = false;     // of compressed data: by a header alone, which CAudioFileIO::OpenDecoder proves
     std::int32_t bytesPerFrame = 0;   // of linear PCM; samples left-aligned in their containers
-    std::int64_t dataSize = 0;        // sample bytes that are in the file
-    std::int64_t missingDataSize = 0; // sample bytes that the header promises and the file ends ahead of
-    TAudioBusFormat busFormat = kAudioBusUndefined;
+    std::int64_t dataSize = 0;        // sample bytes that the file holds
+    std::int64_t missingDataSize = 0; // sample bytes that the header promises beyond the end of the file
+    TAudioBusFormat busFormat = kAudioBusUndefined; // as the header names the speakers; undefined otherwise
     std::int32_t sourceBits = 0; // of a sample those that count: 20 of 24; of lossless codings those of what was coded;
                                  // else 0
 
-    // What else the file says of its sound.
+    // What else the file says about its sound.
     std::uint32_t speakers = 0; // those that the channels feed, as bits of WAVE's channel mask, whatever the channels'
                                 // order; 0 when the file does not say
-    platform::CodingProfile profile = platform::CodingProfile::unknown;
-    std::int32_t audioTracks = 1;    // of which this is the first
-    std::int64_t promisedFrames = 0; // of compressed data: by the headers; 0 where they promise none
+    platform::CodingProfile profile = platform::CodingProfile::unknown; // of the coding, such as the kinds of AAC
+    std::int32_t audioTracks = 1;                                       // this is the first
+    std::int64_t promisedFrames = 0; // of compressed data, by its headers; 0 where they promise none
     std::int64_t dsdRate = 0;        // of 1-bit sound, which is described as the PCM that it decodes to; else 0
 
-    /// Whether all is there that the headers promise.
+    /// Whether everything is there that the headers promise.
     bool IsWhole() const { return missingDataSize == 0 && promisedFrames <= frames; }
+    /// Whether the samples are linear PCM that the library reads itself.
     bool IsLinearPCM() const { return !compressed && bytesPerFrame > 0 && sampleFormat.isSupported(); }
-    /// 5,000 times the tempo in beats per minute, from beat count, rate and frames; 32 low bits.
+    /// The tempo times 5,000, from beat count, rate and frames; the 32 low bits.
     std::uint32_t VireoLoopTempo() const;
 };
 
-/// Describes the file that `file` has open. 0; -39 for a file that ends in its header; kStatusParameterError for one
-/// that is no audio file known here, `info` then holding what was understood (fileType 0, fileLength); the status of a
-/// read that failed. `permission` is the mode that the file was opened with. The mark stays where it was.
+/// Describes the file that `file` has open. 0; -39 for a file that ends in its header; kStatusParameterError when the
+/// library knows no such audio file, with `info` holding what was understood (fileType 0, fileLength); else the
+/// status of a failed read. `permission` is the mode of the open file. The mark stays.
 ///
 /// Compressed files outside the containers, MP3, AAC and M4A, are opened a second time by their path, and so not known
 /// in memory; what only the decoder module could describe is "fmt?" where it does not
@@ -89,7 +91,7 @@ struct KT_EXPORT AudioFileInfo {
 /// unless `framesAreStated`.
 KT_EXPORT std::int32_t GetAudioFileInfo(CFileIO& file, unsigned int permission, AudioFileInfo& info);
 
-/// Channels of a bus format; 0 for values outside 1 to 14.
+/// How many channels a bus format has; 0 for values outside 1 to 14.
 KT_EXPORT int AudioBusFormatChannels(int busFormat);
-/// The first bus format of that many channels; kAudioBusUndefined when there is none.
+/// The first bus format with that many channels; kAudioBusUndefined for none.
 KT_EXPORT TAudioBusFormat AudioBusFormatForChannels(int channels);

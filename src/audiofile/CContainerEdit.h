@@ -1,4 +1,4 @@
-// Safe edits of containers, which are compared before they count: what an edit is not about is there afterwards, to the
+// Safe edits of containers, checked before they take effect: everything that the edit is not about stays, to the
 // byte.
 #pragma once
 
@@ -22,9 +22,9 @@
 ///         return ...;
 class KT_EXPORT CContainerEdit : public CSafeEdit {
 public:
-    /// CSafeEdit::Apply, and what is not in the scope is compared: with the original, byte by byte; after an edit in
-    /// place by the ends of its bodies, for nothing else is left. A difference is a problem of the kind `refused`, and
-    /// Difference tells which.
+    /// CSafeEdit::Apply, followed by a comparison of everything outside the scope: with the original, byte by byte;
+    /// after an edit in place only by the ends of its bodies, since nothing else of it is left. A difference is a
+    /// problem of the kind `refused`, and Difference() says which.
     FileProblem Apply(const EditScope& scope, const Change& change);
 
     /// What the comparison of the last Apply found.

@@ -1,4 +1,4 @@
-// Safe edits of containers that others who coordinate their access (platform/FileCoordination.h) keep away from.
+// // Safe edits of containers under coordinated access (platform/FileCoordination.h).
 #pragma once
 
 #include "audiofile/CContainerEdit.h"
@@ -11,14 +11,14 @@ namespace platform {
 class CoordinatedAccess;
 }
 
+/// How an edit is made, and how long it waits.
 struct CoordinatedEditOptions : SafeEditOptions {
-    /// For how long others are waited for, each time that they are in the way: 0 or more seconds. Without it there is
-    /// no limit.
+    /// How many seconds to wait for others, each time that they are in the way; 0 or more. Null means no limit.
     std::optional<double> timeoutSeconds = std::nullopt;
 };
 
-/// One edit of one file. From Begin to its destruction nobody else has coordinated access to the file, and it is locked
-/// against other edits of this kind. One thread.
+/// One edit of one file. From Begin to its destruction nobody else has coordinated access to the file, and it is
+/// locked against other edits of this kind. One thread.
 class KT_EXPORT CCoordinatedEdit {
 public:
     CCoordinatedEdit();
@@ -27,11 +27,12 @@ public:
     CCoordinatedEdit& operator=(const CCoordinatedEdit&) = delete;
 
     /// Waits for write access, then as CSafeEdit::Begin. Once only. Further problems: `refused`, with kStatusFileBusy
-    /// when the time is up, or with the status of a system that refuses coordination. Only with a limit is there a
-    /// thread that waits, which then goes on until it has what it waits for, and gives that back.
+    /// Waits for write access, then does what CSafeEdit::Begin does. Call it once. A further problem is `refused`,
+    /// with kStatusFileBusy when the time is up, or with the status of a system that refuses coordination. A limit
+    /// needs a thread, which goes on waiting after the time is up, and gives back what it then gets.
     FileProblem Begin(const std::string& path, CoordinatedEditOptions options = {});
 
-    /// As those of CContainerEdit.
+    /// Each as that of CContainerEdit.
     FileProblem Apply(const EditScope& scope, const CSafeEdit::Change& change) { return edit_.Apply(scope, change); }
     const ContainerProblem& Difference() const { return edit_.Difference(); }
     const std::string& Target() const { return edit_.Target(); }

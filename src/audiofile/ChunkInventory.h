@@ -1,4 +1,4 @@
-// The chunks of a container that an edit must leave as they are, listed before it and after it.
+// The chunks that an edit of a container must leave as they are, listed before and after it.
 #pragma once
 
 #include "audiofile/ContainerProblem.h"
@@ -7,23 +7,24 @@
 #include <cstdint>
 #include <vector>
 
-/// Of an open file, which is borrowed: bodies are read from it when two inventories are compared. A damaged last chunk
-/// counts as long as it is, and unused room ("free") does not count.
+/// The chunks of an open file, which is borrowed: comparing two inventories reads bodies from it. A damaged last
+/// chunk counts for as long as it is, and unused room ("free") does not count.
 class KT_EXPORT ChunkInventory {
 public:
-    /// How bodies are compared: byte by byte, with the file of the other inventory, or by digests of their first and
-    /// last bytes, taken at once: of a file that is changed in place nothing else is left.
+    /// How bodies are compared: byte by byte with the file of the other inventory; or by digests of their first and
+    /// last bytes, taken in advance, since a file that is changed in place leaves nothing else to compare.
     enum class Bodies { whole, digests };
 
-    /// Once only. Problems: status, empty, noContainer, chunks, reading.
+    /// Lists the chunks. Call it once. Problems: status, empty, noContainer, chunks, reading.
     ContainerProblem Take(int descriptor, const EditScope& scope, Bodies bodies);
 
-    /// With one that was taken of the same bodies. Problems: changed, tailChanged, cutShort, reading.
+    /// Compares with an inventory of the same file after the edit. Problems: changed, tailChanged, cutShort, reading.
     ContainerProblem Compare(const ChunkInventory& after) const;
 
-    /// Where the last whole chunk ends; what is behind it is no chunk. One of the edit's own that is not all there is
+    /// Where the last whole chunk ends; what follows is no chunk. A chunk of the edit itself that is not all there is
     /// not whole.
     std::int64_t End() const { return end_; }
+    /// In bytes, when the inventory was taken.
     std::int64_t FileLength() const { return fileLength_; }
 
 private:

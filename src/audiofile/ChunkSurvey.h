@@ -1,4 +1,4 @@
-// What an edit of a container would cost: looked at first, since CAudioFileIO does what it is told.
+// What an edit of a container would cost, to be asked ahead of it, since CAudioFileIO does what it is told.
 #pragma once
 
 #include "audiofile/CAudioFileIO.h"
@@ -8,34 +8,36 @@
 #include <cstdint>
 #include <optional>
 
-/// What a walk over a container found, with an eye on one id.
+/// The result of a walk over a container, with the chunks of one id counted.
 struct ChunkSurvey {
-    ContainerExtent extent;
-    std::int64_t count = 0;          // chunks of the id
-    std::int64_t total = 0;          // bytes of their bodies
-    std::optional<ChunkEntry> found; // the one that the library answers with: the last; in CAF the first with a body
+    ContainerExtent extent;          // of the container
+    std::int64_t count = 0;          // how many chunks have the id
+    std::int64_t total = 0;          // the bytes of their bodies
+    std::optional<ChunkEntry> found; // the chunk that a look-up finds: the last; in CAF the first with a body
     std::optional<ChunkEntry> last;  // of the container
 };
 
-/// Problem: chunks.
+/// Walks the container. Problem: chunks.
 KT_EXPORT ContainerProblem SurveyChunks(CAudioFileIO& file, FourCC id, ChunkSurvey& survey);
 
-/// Why chunks should not be added or removed: sound or other data would be lost. An edit is possible all the same.
+/// Why chunks should not be added or removed: sound or other data would be lost. The edit is possible all the same.
 struct ChunkObjection {
+    /// The reason.
     enum class Kind : std::uint8_t {
         none,
-        oneOnly,   // the container has such a chunk, which describes or holds its sound, and has room for one
+        oneOnly,   // such a chunk is there; it describes or holds the sound, and a container has room for one
         soundLost, // the chunk to be removed describes or holds the sound
         tail       // `tail.fault` says what would be lost where the new chunk goes
     };
-    Kind kind = Kind::none;
-    ContainerTail tail;
+    Kind kind = Kind::none; // none: nothing speaks against the edit
+    ContainerTail tail;     // of `tail`
 
+    /// Whether there is an objection.
     explicit operator bool() const { return kind != Kind::none; }
 };
 
-/// Of one more chunk of the surveyed id, where CAudioFileIO::PrepareToAppend runs first. Problem: chunks.
+/// The objection to one more chunk of the surveyed id, after CAudioFileIO::PrepareToAppend. Problem: chunks.
 KT_EXPORT ContainerProblem ObjectToAdding(CAudioFileIO& file, const ChunkSurvey& survey, FourCC id,
                                           ChunkObjection& objection);
-/// Of removing every chunk of the surveyed id.
+/// The objection to removing every chunk of the surveyed id.
 KT_EXPORT ChunkObjection ObjectionToRemoving(const ChunkSurvey& survey, FourCC id);

@@ -11,11 +11,11 @@
 
 #include <cstdint>
 
-/// Sees the bytes on their way: `reading` is 0 for a copy that is about to be written, 1 for what was read. Changes
-/// them in place. Never null.
+/// Changes the bytes on their way, in place: `reading` is 0 for a copy that is about to be written, 1 for bytes that
+/// were read. Never null.
 using ChunkTransform = void (*)(void* data, long size, unsigned char reading);
 
-/// Of CFileUtilAddData, a bit set.
+/// Flags of CFileUtilAddData, a bit set.
 enum : long {
     kChunkDataUnlessLoop = 1, // nothing is stored in a file that is a tagged loop
 };

@@ -7,20 +7,21 @@
 
 #include <cstdint>
 
-/// What GetAudioFileInfo does, over a window that stays in use. `url` is where others may open the file; null for one
-/// in memory.
+/// Does what GetAudioFileInfo does, over a window that stays in use. `url` is where decoders may open the file; null
+/// for a file in memory.
 std::int32_t DescribeAudioFile(FileWindow& file, const platform::URLRef& url, AudioFileInfo& info);
 
 // Compressed audio outside the containers; `info` has its fileLength.
 
+/// Describes a FLAC file by its header; 0 or a status.
 std::int32_t DescribeFLAC(FileWindow& file, AudioFileInfo& info);
-/// A file that begins with `start`; as platform::describeCompressedAudio.
+/// Describes a file that begins with `start`, as platform::describeCompressedAudio does.
 std::int32_t DescribeCompressed(const platform::URL& url, BytesView start, AudioFileInfo& info);
 
-/// The type code by which hosts know a file that the platform's services may name otherwise.
+/// The type code that hosts know, for a code of the platform's services.
 FourCC HostFileType(FourCC type);
 
-/// Sets the sample rate: as it is, and rounded. What is no rate (NaN, infinite, negative, beyond 2^53) gives 0.
+/// Sets both sample rates, one of them rounded; 0 for what is no rate (NaN, infinite, negative, beyond 2^53).
 void SetSampleRate(AudioFileInfo& info, double rate);
-/// Sets what else is known of the sound, behind the frames; what the container has said already stays.
+/// Adds facts about the sound; facts that the container has given stay.
 void SetSoundFacts(AudioFileInfo& info, const platform::SoundFacts& facts);

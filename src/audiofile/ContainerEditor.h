@@ -1,5 +1,5 @@
-// The edits of a container: a chunk put behind its last, and all chunks of an id removed. They work in place and roll
-// nothing back.
+// The edits of a container: adding a chunk after its last, and removing all chunks of an id. They work in place and
+// roll nothing back.
 #pragma once
 
 #include "audiofile/AudioFileInfo.h"
@@ -14,29 +14,31 @@ class CFileIO;
 class FileWindow;
 struct ContainerEnd;
 
-/// Owns neither the file nor its description, which it keeps true where an edit moves the samples or changes the
-/// length.
+/// Edits one file. Owns neither the file nor its description, which it keeps true when an edit moves the samples or
+/// changes the length.
 class ContainerEditor {
 public:
-    // What the edits return beside the status of an operation on the file.
-    static constexpr std::int32_t kAdded = 1;
-    static constexpr std::int32_t kNoChunkedContainer = 0;
-    static constexpr std::int32_t kEndFound = 1;
-    static constexpr std::int32_t kHeaderUnreadable = -2;
-    static constexpr std::int32_t kChunkHeaderFailed = -3; // the first not read, the new one (in CAF: all) not written
-    static constexpr std::int32_t kChunkBodyNotWritten = -4;
-    static constexpr std::int32_t kHeaderNotWritten = -5; // the container's, or that of the last chunk
+    // What the edits return besides the status of an operation on the file.
+    static constexpr std::int32_t kAdded = 1;              // the chunk is there
+    static constexpr std::int32_t kNoChunkedContainer = 0; // the file is no chunked container
+    static constexpr std::int32_t kEndFound = 1;           // findEnd() succeeded
+    static constexpr std::int32_t kHeaderUnreadable = -2;  // the container's header
+    /// the first was not read, or the new one (in CAF: all of it) not written
+    static constexpr std::int32_t kChunkHeaderFailed = -3;
+    static constexpr std::int32_t kChunkBodyNotWritten = -4; // what was written is no whole chunk
+    static constexpr std::int32_t kHeaderNotWritten = -5;    // the container's, or the last chunk's
 
+    /// Borrows both.
     ContainerEditor(CFileIO& file, AudioFileInfo& info) : file_(file), info_(info) {}
 
-    /// kAdded, kNoChunkedContainer, or an error. `atOpen` (may be null) serves while the file's stamp is the one that
-    /// opening met.
+    /// Adds a chunk: kAdded, kNoChunkedContainer, or an error. `atOpen` (may be null) is used while the file's stamp
+    /// is the one of opening.
     std::int32_t append(FourCC id, BytesView body, const ContainerEnd* atOpen = nullptr);
-    /// kEndFound, or what append returns then.
+    /// Finds the container's end: kEndFound, or what append() returns then.
     static std::int32_t findEnd(FileWindow& window, ContainerEnd& end);
-    /// What goes where a CAF file has several: the first that is not empty, as hosts expect it, or all of these.
+    /// Which chunks go where a CAF file has several: the first that is not empty, as hosts expect it, or all.
     enum class OfCAF { first, all };
-    /// 0, also when there was none, or an error. Nothing is removed when a header cannot be read.
+    /// Removes chunks: 0, also when there was none, or an error. Nothing is removed when a header cannot be read.
     std::int32_t remove(FourCC id, OfCAF which = OfCAF::first);
 
 private:

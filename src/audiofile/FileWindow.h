@@ -6,8 +6,9 @@
 
 #include <algorithm>
 
-/// The bytes of a CFileIO, which it does not own. What its write cache holds is part of them.
+/// The bytes of a CFileIO, which it does not own; the bytes in its write cache included.
 class CFileBytes final : public platform::ByteSource {
+    /// Borrows the file.
 public:
     explicit CFileBytes(CFileIO& file) : file_(file) {}
 
@@ -24,15 +25,15 @@ private:
     CFileIO& file_;
 };
 
-/// Ahead of the window, which keeps a reference to it.
-struct FileWindowBytes {
+/// Constructed ahead of the window, which keeps a reference to it.
+struct FileWindowBytes { // see CFileBytes
     CFileBytes bytes;
 };
 
-/// Does not own the file.
+/// A HeaderWindow on a CFileIO, which it does not own.
 class FileWindow : private FileWindowBytes, public platform::HeaderWindow {
 public:
-    /// `length` is that of the file, asked for once.
+    /// `length` is that of the file, in bytes.
     FileWindow(CFileIO& file, std::int64_t length)
         : FileWindowBytes{CFileBytes(file)},
           HeaderWindow(bytes, static_cast<std::uint64_t>(std::max<std::int64_t>(length, 0)))
@@ -41,5 +42,6 @@ public:
     FileWindow(const FileWindow&) = delete;
     FileWindow& operator=(const FileWindow&) = delete;
 
+    /// The length that the window was made with.
     std::int64_t fileLength() const { return static_cast<std::int64_t>(length()); }
 };

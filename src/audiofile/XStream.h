@@ -1,16 +1,17 @@
-// Audio files read by C callers, in any format that the converting reader decodes, as interleaved linear PCM of the
-// caller's choice. Takes a C99 or a C++ compiler. A stream is used by one thread at a time.
+// Audio files for C callers, in any format that the converting reader decodes, as interleaved linear PCM of the
+// caller's choice. For C99 and C++ compilers. One thread at a time uses a stream.
 //
-// Every function returns 0, -50 for a parameter error, -4 from the three that streams do not offer, or another negative
-// or four-character status of the services below.
+// Every function returns 0, -50 for a parameter error, -4 from the three that streams do not offer, or another
+// negative or four-character status of the services below.
 #pragma once
 
 #include "platform/core/Export.h"
 
 #include <stdint.h>
 
-/// A converting reader that is open; an audio file that was created. Pointers to their objects, passed through.
+/// An open stream, to be closed by XStreamClose.
 typedef void* XStreamRef;
+/// A created file, to be closed by XStreamCloseFile.
 typedef void* XStreamFileRef;
 
 /// Made by C++ hosts; C callers pass it on.
@@ -25,24 +26,25 @@ typedef struct XStreamDescription {
     double sampleRate;         //  0
     uint32_t formatId;         //  8  "lpcm" for linear PCM
     uint32_t formatFlags;      // 12  bit 0 float, 1 big-endian, 2 signed integer, 3 packed
-    uint32_t bytesPerPacket;   // 16
-    uint32_t framesPerPacket;  // 20
-    uint32_t bytesPerFrame;    // 24
-    uint32_t channelsPerFrame; // 28
-    uint32_t bitsPerChannel;   // 32
-    uint32_t reserved;         // 36
+    uint32_t bytesPerPacket;   //  16  0: packets differ in size
+    uint32_t framesPerPacket;  //  20  1 for linear PCM
+    uint32_t bytesPerFrame;    //  24  0 for compressed data
+    uint32_t channelsPerFrame; //  28  interleaved
+    uint32_t bitsPerChannel;   //  32  0 for compressed data
+    uint32_t reserved;         //  36  0
 } XStreamDescription;
 
 /// Where channels are (platform::ChannelLayout).
 typedef struct XStreamChannelLayout {
-    uint32_t tag;              //  0
-    uint32_t bitmap;           //  4
-    uint32_t descriptionCount; //  8
+    ///  0  0x10000: `bitmap` counts; 0: `descriptions`; others have their channel count in the low 16 bits
+    uint32_t tag;
+    uint32_t bitmap;           //  4  a bit for each speaker
+    uint32_t descriptionCount; //  8  how many descriptions there are
     struct {
         uint32_t label;       // 12
         uint32_t flags;       // 16
         float coordinates[3]; // 20
-    } descriptions[1];
+    } descriptions[1];        // as many as `descriptionCount`
 } XStreamChannelLayout;
 
 /// What XStreamReadFrames is to do, and did.
@@ -82,6 +84,7 @@ KT_EXPORT int32_t XStreamOpenWithFileRef(const CFileRef* ref, uint32_t flags, ui
 KT_EXPORT int32_t XStreamOpen(const char* path, uint32_t flags, uint32_t reserved1, uint32_t reserved2,
                               const XStreamDescription* clientFormat, const XStreamChannelLayout* clientLayout,
                               XStreamRef* outStream);
+/// Closes a stream; its file too.
 KT_EXPORT int32_t XStreamClose(XStreamRef stream);
 
 /// Reads `frames` frames from `position` on into `buffer`; fewer at the end of the file, and none past it, with 0 as
@@ -92,6 +95,7 @@ KT_EXPORT int32_t XStreamReadFramesSync(XStreamRef stream, int64_t position, uin
 KT_EXPORT int32_t XStreamReadFrames(XStreamRef stream, XStreamReadRequest* request);
 /// Not offered: always -4.
 KT_EXPORT int32_t XStreamWriteFrames(XStreamRef stream, XStreamReadRequest* request);
+/// Each is not offered: always -4.
 KT_EXPORT int32_t XStreamReadPackets(XStreamRef stream, XStreamReadRequest* request);
 KT_EXPORT int32_t XStreamWritePackets(XStreamRef stream, XStreamReadRequest* request);
 
@@ -108,6 +112,7 @@ KT_EXPORT int32_t XStreamSetProperty(XStreamRef stream, uint32_t id, uint32_t si
 #ifdef __cplusplus
 } // extern "C"
 
+/// The same by reference.
 inline int32_t XStreamCreateWithFileRef(const CFileRef& folder, const char* name, uint32_t flags, uint32_t reserved1,
                                         uint32_t fileType, const XStreamDescription* format, uint32_t reserved2,
                                         uint32_t reserved3, XStreamFileRef* outFile)
@@ -115,6 +120,7 @@ inline int32_t XStreamCreateWithFileRef(const CFileRef& folder, const char* name
     return XStreamCreateWithFileRef(&folder, name, flags, reserved1, fileType, format, reserved2, reserved3, outFile);
 }
 
+/// The same by reference.
 inline int32_t XStreamOpenWithFileRef(const CFileRef& ref, uint32_t flags, uint32_t reserved1, uint32_t reserved2,
                                       const XStreamDescription* clientFormat, const XStreamChannelLayout* clientLayout,
                                       XStreamRef* outStream)

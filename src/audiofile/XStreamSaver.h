@@ -4,23 +4,26 @@
 #include "audiofile/XStream.h"
 #include "files/CFileRef.h"
 
-/// Owns its stream. The registry is not locked: savers are made, found and destroyed by one thread at a time.
+/// Owns its stream. The registry has no lock: one thread at a time makes, finds and destroys savers.
 class KT_EXPORT XStreamSaver {
 public:
-    /// Takes the stream over (which may be null) and becomes the first of the registry.
+    /// Takes the stream (which may be null) over and becomes the first in the registry.
     XStreamSaver(void* stream, const CFileRef& ref);
     /// Leaves the registry and closes the stream.
     ~XStreamSaver();
     XStreamSaver(const XStreamSaver&) = delete;
     XStreamSaver& operator=(const XStreamSaver&) = delete;
 
+    /// The stream, still owned here.
     XStreamRef GetStream() const { return stream_; }
+    /// Where the stream came from.
     const CFileRef& GetFileRef() const { return ref_; }
-    /// The saver that was made before, of those that live.
+    /// The saver made before this one, of those that live; null for none.
     XStreamSaver* GetNextXStreamObject() const { return next_; }
 
+    /// The saver made last, of those that live; null for none.
     static XStreamSaver* GetFirstXStreamObject() { return s_First; }
-    /// The latest saver whose reference equals `ref`, or null.
+    /// The latest saver whose reference equals `ref`; null for none.
     static XStreamSaver* FindXStreamObject(const CFileRef& ref);
 
 private:

@@ -151,7 +151,7 @@ public:
     /// The folder on which the item's volume is mounted; invalid on failure.
     CFileRef GetMountPoint() const;
 
-    /// Whether the path is "/".
+    /// Whether the item is the top of its volume: "/", or where a volume is mounted.
     bool IsRoot() const;
     /// Whether something is there, links followed.
     bool Exists() const;

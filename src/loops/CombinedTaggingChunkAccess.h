@@ -1,12 +1,14 @@
-// The combined tags in AIFF: the chunks "basc" and "cate", which the data object sees as one archive.
+// The combined tags in AIFF: the chunks "basc" and "cate", which the data object takes as one archive.
 #pragma once
 
 #include "loops/ChunkAccess.h"
 
 class VireoLoopBaseChunk;
 
+/// Reads "basc" and "cate".
 class KT_EXPORT CombinedTaggingAifChunkReader : public ChunkReader {
 public:
+    /// Borrows both.
     CombinedTaggingAifChunkReader(platform::AudioFile& file, VireoLoopBaseChunk& chunk)
         : ChunkReader(file),
           chunk_(chunk)
@@ -18,8 +20,10 @@ private:
     VireoLoopBaseChunk& chunk_;
 };
 
+/// Writes "basc" and "cate".
 class KT_EXPORT CombinedTaggingAifChunkWriter : public ChunkWriter {
 public:
+    /// Borrows both.
     CombinedTaggingAifChunkWriter(platform::AudioFile& file, VireoLoopBaseChunk& chunk)
         : ChunkWriter(file),
           chunk_(chunk)
@@ -31,8 +35,10 @@ private:
     VireoLoopBaseChunk& chunk_;
 };
 
+/// Removes "basc" and "cate".
 class KT_EXPORT CombinedTaggingAifChunkRemover : public ChunkRemover {
 public:
+    /// Borrows the file.
     using ChunkRemover::ChunkRemover;
     bool removeChunk() override;
 };

@@ -5,8 +5,10 @@
 
 class VireoLoopBaseChunk;
 
+/// Reads the four entries of the information dictionary.
 class KT_EXPORT FileInfoCafChunkReader : public ChunkReader {
 public:
+    /// Borrows both.
     FileInfoCafChunkReader(platform::AudioFile& file, VireoLoopBaseChunk& chunk) : ChunkReader(file), chunk_(chunk) {}
     void readChunk() override;
 
@@ -14,9 +16,10 @@ private:
     VireoLoopBaseChunk& chunk_;
 };
 
-/// Merges: other entries of the file's information stay; a value that is absent becomes "".
+/// Writes the four entries; other entries of the file stay, and a value that is absent becomes "".
 class KT_EXPORT FileInfoCafChunkWriter : public ChunkWriter {
 public:
+    /// Borrows both.
     FileInfoCafChunkWriter(platform::AudioFile& file, VireoLoopBaseChunk& chunk) : ChunkWriter(file), chunk_(chunk) {}
     bool writeChunk() override;
 
@@ -24,15 +27,18 @@ private:
     VireoLoopBaseChunk& chunk_;
 };
 
-/// Takes the four entries out of the file's information and leaves the others.
+/// Removes the four entries and leaves the others.
 class KT_EXPORT FileInfoCafChunkRemover : public ChunkRemover {
 public:
+    /// Borrows the file.
     using ChunkRemover::ChunkRemover;
     bool removeChunk() override;
 };
 
+/// Reads the four text chunks.
 class KT_EXPORT FileInfoAifChunkReader : public ChunkReader {
 public:
+    /// Borrows both.
     FileInfoAifChunkReader(platform::AudioFile& file, VireoLoopBaseChunk& chunk) : ChunkReader(file), chunk_(chunk) {}
     void readChunk() override;
 
@@ -40,9 +46,10 @@ private:
     VireoLoopBaseChunk& chunk_;
 };
 
-/// Writes the chunks of the values that are there; of a value that is absent the file keeps what it has.
+/// Writes the chunks of the values that are there; a chunk whose value is absent stays in the file.
 class KT_EXPORT FileInfoAifChunkWriter : public ChunkWriter {
 public:
+    /// Borrows both.
     FileInfoAifChunkWriter(platform::AudioFile& file, VireoLoopBaseChunk& chunk) : ChunkWriter(file), chunk_(chunk) {}
     bool writeChunk() override;
 
@@ -50,8 +57,10 @@ private:
     VireoLoopBaseChunk& chunk_;
 };
 
+/// Removes the four text chunks.
 class KT_EXPORT FileInfoAifChunkRemover : public ChunkRemover {
 public:
+    /// Borrows the file.
     using ChunkRemover::ChunkRemover;
     bool removeChunk() override;
 };

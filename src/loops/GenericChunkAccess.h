@@ -5,9 +5,10 @@
 
 class VireoLoopBaseChunk;
 
-/// In CAF a "uuid" item of the chunk's UUID, else the first item of the chunk's CAF type.
+/// Reads the "uuid" item of the chunk's UUID in CAF, or the first item of its CAF type when it has no UUID.
 class KT_EXPORT GenericCafChunkReader : public ChunkReader {
 public:
+    /// Borrows both.
     GenericCafChunkReader(platform::AudioFile& file, VireoLoopBaseChunk& chunk) : ChunkReader(file), chunk_(chunk) {}
     void readChunk() override;
 
@@ -15,8 +16,10 @@ private:
     VireoLoopBaseChunk& chunk_;
 };
 
+/// Writes that item.
 class KT_EXPORT GenericCafChunkWriter : public ChunkWriter {
 public:
+    /// Borrows both.
     GenericCafChunkWriter(platform::AudioFile& file, VireoLoopBaseChunk& chunk) : ChunkWriter(file), chunk_(chunk) {}
     bool writeChunk() override;
 
@@ -24,8 +27,10 @@ private:
     VireoLoopBaseChunk& chunk_;
 };
 
+/// Removes all such items.
 class KT_EXPORT GenericCafChunkRemover : public ChunkRemover {
 public:
+    /// Borrows both.
     GenericCafChunkRemover(platform::AudioFile& file, VireoLoopBaseChunk& chunk) : ChunkRemover(file), chunk_(chunk) {}
     bool removeChunk() override;
 
@@ -33,9 +38,10 @@ private:
     VireoLoopBaseChunk& chunk_;
 };
 
-/// In AIFF the first item of the chunk's AIFF id; a chunk without one has nothing there.
+/// Reads the first item of the chunk's AIFF id; a chunk without an id has nothing in AIFF.
 class KT_EXPORT GenericAifChunkReader : public ChunkReader {
 public:
+    /// Borrows both.
     GenericAifChunkReader(platform::AudioFile& file, VireoLoopBaseChunk& chunk) : ChunkReader(file), chunk_(chunk) {}
     void readChunk() override;
 
@@ -43,8 +49,10 @@ private:
     VireoLoopBaseChunk& chunk_;
 };
 
+/// Writes that item.
 class KT_EXPORT GenericAifChunkWriter : public ChunkWriter {
 public:
+    /// Borrows both.
     GenericAifChunkWriter(platform::AudioFile& file, VireoLoopBaseChunk& chunk) : ChunkWriter(file), chunk_(chunk) {}
     bool writeChunk() override;
 
@@ -52,8 +60,10 @@ private:
     VireoLoopBaseChunk& chunk_;
 };
 
+/// Removes all such items.
 class KT_EXPORT GenericAifChunkRemover : public ChunkRemover {
 public:
+    /// Borrows both.
     GenericAifChunkRemover(platform::AudioFile& file, VireoLoopBaseChunk& chunk) : ChunkRemover(file), chunk_(chunk) {}
     bool removeChunk() override;
 

@@ -1,5 +1,5 @@
-// VireoLoopBaseChunk: one kind of loop chunk. It knows how AIFF and CAF name the chunk, owns its data object, and hands
-// out what reads, writes and removes it in a file of either kind. The derived classes are the suite's kinds.
+// VireoLoopBaseChunk: one kind of loop chunk. It knows how AIFF and CAF name the chunk, owns its data object, and
+// makes its readers, writers and removers for either kind of file. The derived classes are the suite's kinds.
 #pragma once
 
 #include "loops/ChunkAccess.h"
@@ -10,10 +10,11 @@
 #include <optional>
 #include <typeinfo>
 
+/// One kind of loop chunk, and its content.
 class KT_EXPORT VireoLoopBaseChunk {
 public:
-    /// What is not given follows from the AIFF id: the CAF type and UUID that carry it. Without a data object, an empty
-    /// VireoLoopGenericChunkData.
+    /// Values that are not given follow from the AIFF id: the CAF type and the UUID that carry it. Without a data
+    /// object it gets an empty VireoLoopGenericChunkData.
     explicit VireoLoopBaseChunk(std::optional<FourCC> aifChunkID = {}, std::optional<FourCC> cafChunkID = {},
                                 const tagging::UUIDBytes* cafChunkUUID = nullptr,
                                 std::unique_ptr<VireoLoopChunkData> chunkData = nullptr);
@@ -21,13 +22,16 @@ public:
     VireoLoopBaseChunk(const VireoLoopBaseChunk&) = delete;
     VireoLoopBaseChunk& operator=(const VireoLoopBaseChunk&) = delete;
 
-    FourCC aifChunkID() const { return aifChunkID_; } // 0: none
-    FourCC cafChunkID() const { return cafChunkID_; }
+    FourCC aifChunkID() const { return aifChunkID_; }                        // 0: none
+    FourCC cafChunkID() const { return cafChunkID_; }                        // 0: none
     const tagging::UUIDBytes* cafChunkUUID() const { return cafChunkUUID_; } // null: none
+    /// Whether CAF carries it as a "uuid" item.
     bool cafChunkIsUUIDChunk() const { return cafChunkUUID_ != nullptr; }
+    /// Each the content, owned by the chunk.
     VireoLoopChunkData& chunkData() { return *chunkData_; }
     const VireoLoopChunkData& chunkData() const { return *chunkData_; }
-    /// The data object where it is of that class itself; null for a derived one, which may read archives its own way.
+    /// The data object if it is of exactly that class; null for a derived class, which may read archives in its own
+    /// way.
     template <class Data>
     Data* chunkDataOfClass()
     {
@@ -35,6 +39,7 @@ public:
         return typeid(data) == typeid(Data) ? static_cast<Data*>(&data) : nullptr;
     }
 
+    /// Each a new object for an open file, which is borrowed; overridden where one item is not enough.
     virtual std::unique_ptr<ChunkReader> cafChunkReader(platform::AudioFile& file);
     virtual std::unique_ptr<ChunkReader> aifChunkReader(platform::AudioFile& file);
     virtual std::unique_ptr<ChunkWriter> cafChunkWriter(platform::AudioFile& file);
@@ -42,7 +47,7 @@ public:
     virtual std::unique_ptr<ChunkRemover> cafChunkRemover(platform::AudioFile& file);
     virtual std::unique_ptr<ChunkRemover> aifChunkRemover(platform::AudioFile& file);
 
-    /// By file type, "caff" or "AIFF"; null for any other.
+    /// Each a new object by file type, "caff" or "AIFF"; null for any other.
     std::unique_ptr<ChunkReader> chunkReader(platform::AudioFile& file, FourCC fileType);
     std::unique_ptr<ChunkWriter> chunkWriter(platform::AudioFile& file, FourCC fileType);
     std::unique_ptr<ChunkRemover> chunkRemover(platform::AudioFile& file, FourCC fileType);

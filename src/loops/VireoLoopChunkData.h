@@ -1,5 +1,5 @@
-// The in-memory form of one loop chunk: filled from the bytes of an AIFF chunk or of a CAF payload, and able to give
-// the bytes for either, so that tags move between the two kinds of file by way of these objects.
+// The content of one loop chunk in memory: read from an AIFF chunk or a CAF payload, and written as either, so that
+// tags move between the two kinds of file.
 #pragma once
 
 #include "platform/core/Bytes.h"
@@ -13,15 +13,19 @@ class KT_EXPORT VireoLoopChunkData {
 public:
     virtual ~VireoLoopChunkData();
 
-    /// setChunkData:forAudioFileType: — "AIFF" or "caff"; any other type does nothing.
+    /// `setChunkData:forAudioFileType:`: reads the bytes of a chunk, "AIFF" or "caff"; any other type does nothing.
     void setChunkData(BytesView data, FourCC audioFileType);
-    /// chunkDataForAudioFileType: — none for any other type.
+    /// `chunkDataForAudioFileType:`: the bytes of a chunk; null for any other type, and when there is nothing to
+    /// write.
     std::optional<Bytes> chunkDataForAudioFileType(FourCC audioFileType) const;
 
+    /// Whether there is nothing to write.
     virtual bool isEmpty() const { return true; }
+    /// The bytes of the AIFF chunk; null when empty.
     virtual std::optional<Bytes> aifDataRepresentation() const { return std::nullopt; }
+    /// The payload in CAF; null when empty.
     virtual std::optional<Bytes> cafDataRepresentation() const { return std::nullopt; }
-    /// readFromAIFData: and readFromCafData: — take what can be read and leave out the rest.
+    /// `readFromAIFData:`, `readFromCafData:`: each takes what can be read, and leaves out the rest.
     virtual void readFromAIFData(BytesView) {}
     virtual void readFromCafData(BytesView) {}
 

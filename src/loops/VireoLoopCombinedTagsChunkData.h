@@ -6,6 +6,7 @@
 
 #include <utility>
 
+/// The musical tags as a dictionary. A value without a key is not known.
 class KT_EXPORT VireoLoopCombinedTagsChunkData : public VireoLoopGenericChunkData {
 public:
     bool isEmpty() const override { return _dataDictionary.empty(); }
@@ -14,7 +15,7 @@ public:
     void readFromAIFData(BytesView data) override;
     void readFromCafData(BytesView data) override;
 
-    /// Under the VireoLoopCombinedTagsChunkData keys.
+    /// Each the tags under the VireoLoopCombinedTagsChunkData keys.
     const platform::Dictionary& dataDictionary() const& { return _dataDictionary; }
     platform::Dictionary dataDictionary() && { return std::move(_dataDictionary); }
     void setDataDictionary(platform::Dictionary tags) { _dataDictionary = std::move(tags); }

@@ -1,4 +1,4 @@
-// What a loop says of its origin: title, artist, copyright, comments.
+// Where a loop comes from: title, artist, copyright, comments.
 #pragma once
 
 #include "loops/VireoLoopChunkData.h"
@@ -6,6 +6,7 @@
 
 #include <utility>
 
+/// The four texts as a dictionary.
 class KT_EXPORT VireoLoopFileInfoChunkData : public VireoLoopChunkData {
 public:
     bool isEmpty() const override { return _dataDictionary.empty(); }
@@ -14,7 +15,7 @@ public:
     void readFromAIFData(BytesView data) override;
     void readFromCafData(BytesView data) override;
 
-    /// Under the VireoLoopFileInfoChunkData keys.
+    /// Each the texts under the VireoLoopFileInfoChunkData keys.
     const platform::Dictionary& dataDictionary() const& { return _dataDictionary; }
     platform::Dictionary dataDictionary() && { return std::move(_dataDictionary); }
     void setDataDictionary(platform::Dictionary info) { _dataDictionary = std::move(info); }

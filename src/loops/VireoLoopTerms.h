@@ -1,4 +1,4 @@
-// What the numbers of a loop's tags are called by musicians, and the tempo that follows from them.
+// The musical terms for the numbers of a loop's tags, and the tempo that follows from them.
 #pragma once
 
 #include "platform/core/Export.h"
@@ -7,8 +7,8 @@
 #include <optional>
 #include <string_view>
 
-/// "C" to "B" for the MIDI notes 48 to 59, as which keys are kept: the spellings that CAF files have ("Db", but "D#").
-/// Empty for other notes.
+/// "C" to "B" for the MIDI notes 48 to 59, in which keys are stored, spelt as in CAF files ("Db", but "D#"). Empty
+/// for other notes.
 KT_EXPORT std::string_view VireoLoopNoteName(std::int64_t midiNote);
 /// The MIDI note, 48 to 59, of a key's name: a letter, large or small, with "#" or "b" behind it or nothing; "B#" is
 /// "C". None for other texts.
@@ -16,8 +16,8 @@ KT_EXPORT std::optional<std::int64_t> VireoLoopNoteNamed(std::string_view name);
 
 /// "none", "minor", "major", "neither", "both" for the key types 0 to 4; empty for others.
 KT_EXPORT std::string_view VireoLoopModeName(std::int64_t keyType);
-/// The key type of exactly such a name.
+/// The key type of exactly such a name; null for another.
 KT_EXPORT std::optional<std::int64_t> VireoLoopModeNamed(std::string_view name);
 
-/// In beats per minute, of so many beats in so many frames, at a rate in Hz; 0 when one of them is not known.
+/// The tempo in beats per minute of so many beats in so many frames at a rate in Hz; 0 when one of them is unknown.
 KT_EXPORT double VireoLoopTempo(std::int64_t beats, std::uint64_t frames, double sampleRate);

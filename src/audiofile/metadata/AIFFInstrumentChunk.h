@@ -7,14 +7,16 @@
 
 #include <cstddef>
 
-/// A loop of "INST"; 6 bytes.
+/// A loop of "INST": 6 bytes.
 struct AIFFLoop {
+    /// How a loop is played.
     enum Mode : std::int16_t { kNone, kForward, kForwardBackward };
 
     Packed<std::int16_t> mode;        // 0  Mode
     Packed<std::int16_t> beginMarker; // 2  id of a marker: the first frame played stands behind it
     Packed<std::int16_t> endMarker;   // 4  id of a marker: the last frame played stands ahead of it
 
+    /// Turns every number from `order` to the host's order, or back.
     void byteOrder(std::endian order) { turnFields(order, mode, beginMarker, endMarker); }
     friend bool operator==(const AIFFLoop&, const AIFFLoop&) = default;
 };
@@ -32,6 +34,7 @@ struct AIFFInstrumentFields {
     AIFFLoop sustainLoop;             //  8  while the note is held
     AIFFLoop releaseLoop;             // 14  afterwards
 
+    /// Turns every number from `order` to the host's order, or back.
     void byteOrder(std::endian order)
     {
         turnFields(order, gain);
@@ -44,8 +47,9 @@ static_assert(sizeof(AIFFInstrumentFields) == 20 && offsetof(AIFFInstrumentField
 
 /// Published source: Audio Interchange File Format AIFF-C, Instrument Chunk. Big-endian.
 struct KT_EXPORT AIFFInstrumentChunk : AIFFInstrumentFields {
-    /// None of fewer than 20 bytes.
+    /// Null for fewer than 20 bytes.
     static std::optional<AIFFInstrumentChunk> read(BytesView body);
+    /// The body of the chunk: what was read, with the changes since.
     Bytes write() const;
     friend bool operator==(const AIFFInstrumentChunk&, const AIFFInstrumentChunk&) = default;
 

@@ -17,6 +17,7 @@ struct AcidFields {
     Packed<std::uint16_t> meterNumerator;   // 18  3 of 3/4
     Packed<float> tempo;                    // 20  beats per minute
 
+    /// Turns every number from `order` to the host's order, or back.
     void byteOrder(std::endian order)
     {
         turnFields(order, flags, rootNote, unknown, unknown2, beats, meterDenominator, meterNumerator, tempo);
@@ -27,18 +28,21 @@ static_assert(sizeof(AcidFields) == 24 && offsetof(AcidFields, beats) == 12 && o
 
 /// Published layout: libsndfile, wavlike.c, wavlike_read_acid; the flags as lists of RIFF tags give them.
 struct KT_EXPORT AcidChunk : AcidFields {
+    /// Bits of `flags`.
     enum Flags : std::uint32_t { // of `flags`
         kOneShot = 1,            // a sound, not a loop
-        kRootNoteSet = 2,
-        kStretched = 4, // follows the tempo of a project
-        kOnDisk = 8,    // played from the disk, not from memory
-        kHighOctave = 16,
+        kRootNoteSet = 2,        // rootNote counts
+        kStretched = 4,          // follows the tempo of a project
+        kOnDisk = 8,             // played from the disk, not from memory
+        kHighOctave = 16,        // of the sampler
     };
 
-    /// None of fewer than 24 bytes. Of RIFX the order is big.
+    /// Null for fewer than 24 bytes. In RIFX the order is big.
     static std::optional<AcidChunk> read(BytesView body, std::endian order = std::endian::little);
+    /// The body of the chunk: what was read, with the changes since.
     Bytes write(std::endian order = std::endian::little) const;
 
+    /// Whether a bit of `flags` is set.
     bool has(Flags flag) const { return (flags & flag) != 0; }
     friend bool operator==(const AcidChunk&, const AcidChunk&) = default;
 

@@ -7,9 +7,9 @@
 
 #include <cstddef>
 
-/// These members, top to bottom, are the first 602 bytes of "bext". Texts are ASCII by the source.
+/// The first 602 bytes of "bext", top to bottom. Texts are ASCII by the source.
 struct BroadcastFields {
-    static constexpr std::int16_t kNoLoudness = 0x7FFF; // of the five values of loudness
+    static constexpr std::int16_t kNoLoudness = 0x7FFF; // a value of the five loudness fields: unknown
 
     FixedText<256> description;                //   0
     FixedText<32> originator;                  // 256
@@ -27,6 +27,7 @@ struct BroadcastFields {
     Packed<std::int16_t> maxShortTermLoudness; // 420  1/100 LUFS
     std::array<std::byte, 180> reserved{};     // 422
 
+    /// Turns every number from `order` to the host's order, or back.
     void byteOrder(std::endian order)
     {
         turnFields(order, timeReferenceLow, timeReferenceHigh, version, loudnessValue, loudnessRange, maxTruePeakLevel,
@@ -39,23 +40,28 @@ static_assert(sizeof(BroadcastFields) == 602 && offsetof(BroadcastFields, timeRe
 
 /// Published source: EBU Tech 3285, versions 0 to 2.
 struct KT_EXPORT BroadcastExtension : BroadcastFields {
-    /// None of fewer than 602 bytes. Of RIFX the order is big.
+    /// Null for fewer than 602 bytes. In RIFX the order is big.
     static std::optional<BroadcastExtension> read(BytesView body, std::endian order = std::endian::little);
+    /// The body of the chunk: what was read, with the changes since.
     Bytes write(std::endian order = std::endian::little) const;
 
-    /// The first frame's distance from midnight, in frames.
+    /// The distance of the first frame from midnight, in frames.
     std::uint64_t timeReference() const
     {
         return std::uint64_t{timeReferenceHigh} << 32 | std::uint64_t{timeReferenceLow};
     }
+    /// Sets timeReference().
     void setTimeReference(std::uint64_t frames)
     {
         timeReferenceLow = static_cast<std::uint32_t>(frames);
         timeReferenceHigh = static_cast<std::uint32_t>(frames >> 32);
     }
+    /// Whether the version has a UMID, and it is not all zeros.
     bool hasUMID() const { return version >= 1 && umid != decltype(umid){}; }
+    /// Whether the version has the five loudness fields.
     bool hasLoudness() const { return version >= 2; }
-    /// The history's lines that are not empty, up to a NUL, the first coding first ("A=PCM,F=48000,W=24,M=stereo").
+    /// The lines of the history that are not empty, up to a NUL, the first coding first
+    /// ("A=PCM,F=48000,W=24,M=stereo").
     std::vector<std::string> codingHistoryLines() const;
     friend bool operator==(const BroadcastExtension&, const BroadcastExtension&) = default;
 

@@ -19,6 +19,7 @@ struct CAFInstrumentFields {
     Packed<std::uint32_t> releaseRegion; // 20
     Packed<std::uint32_t> instrumentId;  // 24  of its text in "strg"
 
+    /// Turns every number from `order` to the host's order, or back.
     void byteOrder(std::endian order)
     {
         turnFields(order, baseNote, gain, startRegion, sustainRegion, releaseRegion, instrumentId);
@@ -29,8 +30,9 @@ static_assert(sizeof(CAFInstrumentFields) == 28 && offsetof(CAFInstrumentFields,
 
 /// Published source: the published format description, version 1.0, Instrument chunk. Big-endian.
 struct KT_EXPORT CAFInstrumentChunk : CAFInstrumentFields {
-    /// None of fewer than 28 bytes.
+    /// Null for fewer than 28 bytes.
     static std::optional<CAFInstrumentChunk> read(BytesView body);
+    /// The body of the chunk: what was read, with the changes since.
     Bytes write() const;
     friend bool operator==(const CAFInstrumentChunk&, const CAFInstrumentChunk&) = default;
 

@@ -14,6 +14,7 @@ struct CAFTimecode {
     Packed<std::int8_t> frames;                 // 3
     Packed<std::uint32_t> subFrameSampleOffset; // 4
 
+    /// Turns every number from `order` to the host's order, or back.
     void byteOrder(std::endian order) { turnFields(order, subFrameSampleOffset); }
     friend bool operator==(const CAFTimecode&, const CAFTimecode&) = default;
 };
@@ -26,6 +27,7 @@ struct CAFMarker {
     CAFTimecode timecode;          // 16
     Packed<std::uint32_t> channel; // 24  0 all channels
 
+    /// Turns every number from `order` to the host's order, or back.
     void byteOrder(std::endian order)
     {
         turnFields(order, type, framePosition, id, channel);
@@ -37,8 +39,9 @@ static_assert(sizeof(CAFMarker) == 28 && offsetof(CAFMarker, id) == 12 && offset
 
 /// The chunk "mark". Published source: the published format description, version 1.0, Marker chunk. Big-endian.
 struct KT_EXPORT CAFMarkerList {
-    /// None of fewer than 8 bytes.
+    /// Null for fewer than 8 bytes.
     static std::optional<CAFMarkerList> read(BytesView body);
+    /// The body of the chunk: what was read, with the changes since.
     Bytes write() const;
     friend bool operator==(const CAFMarkerList&, const CAFMarkerList&) = default;
 
@@ -50,6 +53,7 @@ struct KT_EXPORT CAFMarkerList {
 
 /// A stretch of the sound between its markers.
 struct CAFRegion {
+    /// Bits of `flags`.
     enum Flags : std::uint32_t { kLoops = 1, kPlaysForward = 2, kPlaysBackward = 4 };
 
     std::uint32_t id = 0;             // of its text in "strg"
@@ -61,13 +65,14 @@ struct CAFRegion {
 
 /// The chunk "regn". Published source: as of "mark", Region chunk.
 struct KT_EXPORT CAFRegionList {
-    /// None of fewer than 8 bytes.
+    /// Null for fewer than 8 bytes.
     static std::optional<CAFRegionList> read(BytesView body);
+    /// The body of the chunk: what was read, with the changes since.
     Bytes write() const;
     friend bool operator==(const CAFRegionList&, const CAFRegionList&) = default;
 
-    std::uint32_t timecodeType = 0;
-    std::vector<CAFRegion> regions;
-    std::uint32_t missingRegions = 0;
-    Bytes behind;
+    std::uint32_t timecodeType = 0;   // as in CAFMarkerList
+    std::vector<CAFRegion> regions;   // those that are there
+    std::uint32_t missingRegions = 0; // stated, and not there: write() states them again
+    Bytes behind;                     // what no region counts
 };

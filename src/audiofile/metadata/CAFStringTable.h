@@ -9,6 +9,7 @@ struct CAFStringEntry {
     Packed<std::uint32_t> id;    // 0
     Packed<std::int64_t> offset; // 4  of its first byte, behind the last entry
 
+    /// Turns every number from `order` to the host's order, or back.
     void byteOrder(std::endian order) { turnFields(order, id, offset); }
     friend bool operator==(const CAFStringEntry&, const CAFStringEntry&) = default;
 };
@@ -17,8 +18,9 @@ static_assert(sizeof(CAFStringEntry) == 12);
 /// Published source: the published format description, version 1.0, Strings chunk. Big-endian: a count of 4 bytes,
 /// entries, and their texts in UTF-8, each up to a NUL.
 struct KT_EXPORT CAFStringTable {
-    /// None of fewer than 4 bytes.
+    /// Null for fewer than 4 bytes.
     static std::optional<CAFStringTable> read(BytesView body);
+    /// The body of the chunk: what was read, with the changes since.
     Bytes write() const;
     /// The text of an entry, up to a NUL or the end of the chunk; none when it begins outside.
     std::optional<std::string> textOf(const CAFStringEntry& entry) const;

@@ -12,6 +12,7 @@ struct CartTimer {
     Packed<FourCC> usage;        // 0  "SEG1", "AUDs", "INT1" …; 0 unused
     Packed<std::uint32_t> value; // 4  in frames
 
+    /// Turns every number from `order` to the host's order, or back.
     void byteOrder(std::endian order)
     {
         turnFields(std::endian::big, usage);
@@ -42,6 +43,7 @@ struct CartFields {
     std::array<std::byte, 276> reserved{}; //  748
     FixedText<1024> url;                   // 1024
 
+    /// Turns every number from `order` to the host's order, or back.
     void byteOrder(std::endian order)
     {
         turnFields(order, levelReference);
@@ -55,8 +57,9 @@ static_assert(sizeof(CartFields) == 2048 && offsetof(CartFields, startDate) == 4
 
 /// Published source: AES46-2002.
 struct KT_EXPORT CartChunk : CartFields {
-    /// None of fewer than 2048 bytes. Of RIFX the order is big.
+    /// Null for fewer than 2048 bytes. In RIFX the order is big.
     static std::optional<CartChunk> read(BytesView body, std::endian order = std::endian::little);
+    /// The body of the chunk: what was read, with the changes since.
     Bytes write(std::endian order = std::endian::little) const;
     friend bool operator==(const CartChunk&, const CartChunk&) = default;
 

@@ -9,6 +9,7 @@
 #include <string>
 #include <vector>
 
+/// A remark.
 struct AIFFComment {
     /// Seconds from 1904-01-01, of which `timeStamp` counts, to 1970-01-01.
     static constexpr std::uint32_t kSecondsTo1970 = 2'082'844'800;
@@ -25,8 +26,9 @@ struct AIFFComment {
 struct KT_EXPORT CommentList {
     static constexpr std::size_t kMostComments = 65535; // more are not written
 
-    /// None of fewer than 2 bytes.
+    /// Null for fewer than 2 bytes.
     static std::optional<CommentList> read(BytesView body);
+    /// The body of the chunk: what was read, with the changes since.
     Bytes write() const;
     friend bool operator==(const CommentList&, const CommentList&) = default;
 

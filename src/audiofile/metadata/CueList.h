@@ -16,6 +16,7 @@ struct CuePoint {
     Packed<std::uint32_t> blockStart;            // 16  0 of linear PCM
     Packed<std::uint32_t> sampleOffset;          // 20  the frame that the point stands ahead of
 
+    /// Turns every number from `order` to the host's order, or back.
     void byteOrder(std::endian order)
     {
         turnFields(order, id, position, chunkStart, blockStart, sampleOffset);
@@ -27,8 +28,9 @@ static_assert(sizeof(CuePoint) == 24 && offsetof(CuePoint, sampleOffset) == 20);
 
 /// Published source: RIFF 1.0 of 1991, Cue-Points Chunk.
 struct KT_EXPORT CueList {
-    /// None of fewer than 4 bytes. Of RIFX the order is big.
+    /// Null for fewer than 4 bytes. In RIFX the order is big.
     static std::optional<CueList> read(BytesView body, std::endian order = std::endian::little);
+    /// The body of the chunk: what was read, with the changes since.
     Bytes write(std::endian order = std::endian::little) const;
     /// The first point of an id; null when there is none.
     const CuePoint* find(std::uint32_t id) const;

@@ -6,15 +6,17 @@
 #include <string>
 #include <string_view>
 
-/// Bytes, filled up with NUL; a text that fills the field has none. Packed as it stands in the file.
+/// A text in a field of `size` bytes, padded with NUL; a text that fills the field has no NUL. Laid out as in the
+/// file.
 template <std::size_t size>
 struct FixedText {
-    std::array<char, size> bytes{};
+    std::array<char, size> bytes{}; // as in the file
 
+    /// The size of the field, in bytes.
     static constexpr std::size_t capacity() { return size; }
-    /// Up to the first NUL.
+    /// The text up to the first NUL.
     std::string text() const { return std::string(bytes.begin(), std::ranges::find(bytes, '\0')); }
-    /// False, and nothing changed, of a text that has no room.
+    /// Sets the text; false, and nothing changed, when it does not fit.
     bool set(std::string_view text)
     {
         if (text.size() > size)

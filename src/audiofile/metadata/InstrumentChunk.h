@@ -17,6 +17,7 @@ struct InstrumentFields {
     Packed<std::uint8_t> lowVelocity;   // 5  1 to 127
     Packed<std::uint8_t> highVelocity;  // 6  1 to 127
 
+    /// Does nothing: no field has more than a byte.
     void byteOrder(std::endian) {}
     friend bool operator==(const InstrumentFields&, const InstrumentFields&) = default;
 };
@@ -24,8 +25,9 @@ static_assert(sizeof(InstrumentFields) == 7);
 
 /// Published source: Multimedia Data Standards Update, 1994, Instrument chunk.
 struct KT_EXPORT InstrumentChunk : InstrumentFields {
-    /// None of fewer than 7 bytes.
+    /// Null for fewer than 7 bytes.
     static std::optional<InstrumentChunk> read(BytesView body);
+    /// The body of the chunk: what was read, with the changes since.
     Bytes write() const;
     friend bool operator==(const InstrumentChunk&, const InstrumentChunk&) = default;
 

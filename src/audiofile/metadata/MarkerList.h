@@ -10,6 +10,7 @@
 #include <string>
 #include <vector>
 
+/// A point with a name.
 struct AIFFMarker {
     std::int16_t id = 0;        // above 0, of its own within the file
     std::uint32_t position = 0; // 0 ahead of the first frame, 1 behind it, and so on
@@ -23,8 +24,9 @@ struct AIFFMarker {
 struct KT_EXPORT MarkerList {
     static constexpr std::size_t kMostMarkers = 65535; // more are not written
 
-    /// None of fewer than 2 bytes.
+    /// Null for fewer than 2 bytes.
     static std::optional<MarkerList> read(BytesView body);
+    /// The body of the chunk: what was read, with the changes since.
     Bytes write() const;
     /// The first marker of an id; null when there is none.
     const AIFFMarker* find(std::int16_t id) const;

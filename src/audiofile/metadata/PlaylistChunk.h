@@ -10,6 +10,7 @@ struct PlaylistSegment {
     Packed<std::uint32_t> length; // 4  in frames
     Packed<std::uint32_t> loops;  // 8  how often it is played
 
+    /// Turns every number from `order` to the host's order, or back.
     void byteOrder(std::endian order) { turnFields(order, cueId, length, loops); }
     friend bool operator==(const PlaylistSegment&, const PlaylistSegment&) = default;
 };
@@ -17,8 +18,9 @@ static_assert(sizeof(PlaylistSegment) == 12);
 
 /// Published source: RIFF 1.0 of 1991, Playlist Chunk.
 struct KT_EXPORT PlaylistChunk {
-    /// None of fewer than 4 bytes. Of RIFX the order is big.
+    /// Null for fewer than 4 bytes. In RIFX the order is big.
     static std::optional<PlaylistChunk> read(BytesView body, std::endian order = std::endian::little);
+    /// The body of the chunk: what was read, with the changes since.
     Bytes write(std::endian order = std::endian::little) const;
     friend bool operator==(const PlaylistChunk&, const PlaylistChunk&) = default;
 

@@ -10,7 +10,7 @@
 #include <optional>
 #include <vector>
 
-/// The record that stands next, in host order; none when fewer bytes are left, of which it then takes none.
+/// The next record, in host order; null, and nothing taken, when fewer bytes are left.
 template <class Record>
 std::optional<Record> takeRecord(ByteReader& reader, std::endian order)
 {
@@ -23,7 +23,7 @@ std::optional<Record> takeRecord(ByteReader& reader, std::endian order)
     return record;
 }
 
-/// As many of `stated` records as are there.
+/// As many of `stated` records as there are.
 template <class Record>
 std::vector<Record> takeRecords(ByteReader& reader, std::uint32_t stated, std::endian order)
 {
@@ -35,6 +35,7 @@ std::vector<Record> takeRecords(ByteReader& reader, std::uint32_t stated, std::e
     return records;
 }
 
+/// Appends a record, turned from host order to `order`.
 template <class Record>
 void putRecord(ByteWriter& writer, Record record, std::endian order)
 {
@@ -42,7 +43,7 @@ void putRecord(ByteWriter& writer, Record record, std::endian order)
     writer.write(std::as_bytes(std::span(&record, 1)));
 }
 
-/// What is left, owned.
+/// A copy of the bytes that are left.
 inline Bytes takeRest(ByteReader& reader)
 {
     const BytesView rest = reader.take(reader.remaining());

@@ -8,6 +8,7 @@
 
 /// One loop of "smpl"; these members, top to bottom, are its 24 bytes.
 struct SamplerLoop {
+    /// How a loop is played.
     enum Type : std::uint32_t { kForward, kAlternating, kBackward }; // 3 to 31 reserved, from 32 on the makers'
 
     Packed<std::uint32_t> cueId;     //  0  of a point of "cue "
@@ -17,6 +18,7 @@ struct SamplerLoop {
     Packed<std::uint32_t> fraction;  // 16  of a frame, in 1/2^32
     Packed<std::uint32_t> playCount; // 20  0: until it is released
 
+    /// Turns every number from `order` to the host's order, or back.
     void byteOrder(std::endian order) { turnFields(order, cueId, type, start, end, fraction, playCount); }
     friend bool operator==(const SamplerLoop&, const SamplerLoop&) = default;
 };
@@ -32,6 +34,7 @@ struct SamplerFields {
     Packed<std::uint32_t> smpteFormat;       // 20  0 none, 24, 25, 29 (30 drop) or 30 frames a second
     Packed<std::uint32_t> smpteOffset;       // 24  hours (signed), minutes, seconds, frames: a byte each, from the top
 
+    /// Turns every number from `order` to the host's order, or back.
     void byteOrder(std::endian order)
     {
         turnFields(order, manufacturer, product, samplePeriod, midiUnityNote, midiPitchFraction, smpteFormat,
@@ -43,8 +46,9 @@ static_assert(sizeof(SamplerFields) == 28 && offsetof(SamplerFields, smpteOffset
 
 /// Published source: Multimedia Data Standards Update, 1994, Sample chunk.
 struct KT_EXPORT SamplerChunk : SamplerFields {
-    /// None of fewer than 36 bytes. Of RIFX the order is big.
+    /// Null for fewer than 36 bytes. In RIFX the order is big.
     static std::optional<SamplerChunk> read(BytesView body, std::endian order = std::endian::little);
+    /// The body of the chunk: what was read, with the changes since.
     Bytes write(std::endian order = std::endian::little) const;
     friend bool operator==(const SamplerChunk&, const SamplerChunk&) = default;
 

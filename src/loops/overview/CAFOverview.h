@@ -1,5 +1,5 @@
-// The overview chunk of CAF, "ovvw", made of an overview block, and blocks made of its pairs. Published source: the
-// format description of CAF, version 1.0. Page: docs/formats/overview.md.
+// The overview chunk of CAF, "ovvw", made from an overview block, and blocks made from its pairs. Published source:
+// the format description of CAF, version 1.0. Page: docs/formats/overview.md.
 #pragma once
 
 #include "loops/overview/OverviewBlock.h"
@@ -10,14 +10,15 @@
 
 /// The start of the chunk's body; pairs follow it. Big-endian.
 struct CAFOverviewHeader {
-    Packed<std::uint32_t> editCount;       // 0  that of the "data" chunk, as it stands there
-    Packed<std::uint32_t> framesPerSample; // 4
+    Packed<std::uint32_t> editCount;       // 0  that of the "data" chunk, in the order of the file
+    Packed<std::uint32_t> framesPerSample; // 4  frames that a pair stands for
 };
 static_assert(sizeof(CAFOverviewHeader) == 8);
 
+/// One pair, big-endian.
 struct CAFOverviewPair {
-    Packed<std::int16_t> minimum; // 0
-    Packed<std::int16_t> maximum; // 2
+    Packed<std::int16_t> minimum; // 0  the lowest sample
+    Packed<std::int16_t> maximum; // 2  the highest sample
 };
 static_assert(sizeof(CAFOverviewPair) == 4);
 
@@ -25,17 +26,17 @@ static_assert(sizeof(CAFOverviewPair) == 4);
 bool makeCAFOverview(const KTMem& overview, Packed<std::uint32_t> editCount, KTMem& body);
 
 /// Folds pairs, each of so many frames, into the points of a block. A point gets the lowest minimum and the highest
-/// maximum of the pairs that reach into it; where pairs are missing they count as zeros.
+/// maximum of the pairs that reach into it; missing pairs count as zeros.
 class CAFOverviewFolder {
 public:
-    /// The block is sized for the frames and filled with zeros; it outlives the folder.
+    /// Sizes the block for the frames and fills it with zeros; the block must outlive the folder.
     CAFOverviewFolder(KTMem& block, std::int64_t frames, std::int64_t framesPerPair);
 
-    /// Whether every frame has its pair.
+    /// Whether all frames have their pair.
     bool isDone() const { return frame_ >= frames_; }
-    /// The next pair, as it is stored.
+    /// Adds the next pair, in the order of the file.
     void add(CAFOverviewPair pair);
-    /// To be called when no pair is left.
+    /// Folds what is left; call it after the last pair.
     void finish();
 
 private:

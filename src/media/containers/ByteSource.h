@@ -1,4 +1,4 @@
-// Where the bytes of a file come from: a descriptor (FileBytes), or whatever a caller reads its files by.
+// Where the bytes of a file come from: a descriptor (FileBytes), or whatever a caller reads files by.
 #pragma once
 
 #include <cstddef>
@@ -6,6 +6,7 @@
 
 namespace platform {
 
+/// Random access to bytes.
 class ByteSource {
 public:
     /// Reads up to `count` bytes; fewer only at the end of the file. 0 or a negative status.

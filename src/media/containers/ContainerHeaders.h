@@ -11,6 +11,7 @@
 #include <cstddef>
 #include <cstdint>
 
+/// Each is an id or a form in a container, by its name.
 inline constexpr FourCC kRIFF = fourCC("RIFF");
 inline constexpr FourCC kRF64 = fourCC("RF64");
 inline constexpr FourCC kBW64 = fourCC("BW64");
@@ -70,16 +71,20 @@ struct KT_EXPORT ContainerChkExtended {
     Packed<std::uint32_t> tableLength;                // 44
     std::array<Ds64TableEntry, kTableCapacity> table; // 48
 
+    /// Whether the form is "WAVE".
     bool IsWAVE() const { return formType == kWAVE; }
+    /// Whether the first chunk is a "ds64" with its 28 bytes.
     bool HasValidDs64() const;
-    /// A "JUNK" chunk that can become a "ds64" in place.
+    /// Whether the first chunk is a "JUNK" that can become a "ds64" in place.
     bool HasJunkReservation() const;
     /// The size of the container's content, from offset 8 on: from the "ds64" where the field refers to it.
     std::int64_t EffectiveSize() const;
-    /// How many bytes of this record a writer puts at offset 0: the 64-bit values go along where they count.
+    /// How many bytes of this record a writer puts at offset 0, with the 64-bit values where they count.
     std::size_t StoredSize() const;
-    /// The container-size rule: also turns RIFF with a reservation into RF64 and back as the size demands.
+    /// Stores the size of the container, and turns RIFF with a reservation into RF64 and back as the size demands. 0,
+    /// or kChunkSizeTooLarge.
     std::int32_t SetSize(long long size);
+    /// File layout to host order, and back.
     void ByteOrder();
 };
 static_assert(sizeof(ContainerChkExtended) == 84);
@@ -92,8 +97,9 @@ struct KT_EXPORT ChkHeader {
 
     /// The size of the body; negative for an AIFF size of 2^31 or more.
     std::int64_t EffectiveSize(const ContainerChkExtended& header) const;
-    /// The chunk-size rule: may store a 64-bit size in `header`.
+    /// Stores the size of a body, which may put a 64-bit size into `header`. 0, or kChunkSizeTooLarge.
     std::int32_t SetSize(long long size, ContainerChkExtended& header);
+    /// File layout to host order, and back.
     void ByteOrder(const ContainerChkExtended& header);
 };
 static_assert(sizeof(ChkHeader) == 8);

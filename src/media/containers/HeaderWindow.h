@@ -1,5 +1,5 @@
-// A window on the bytes of an open file: headers, and the small chunks beside them, are read through it, so that those
-// which lie together cost one call, however often they are asked for.
+// A window on the bytes of an open file: headers, and small chunks beside them, are read through it, so that those
+// which lie together cost one call however often they are read.
 #pragma once
 
 #include "media/containers/ByteSource.h"
@@ -11,26 +11,28 @@
 
 namespace platform {
 
-/// Keeps two pieces of the file: its start, and what was read last elsewhere, which is where the chunks behind the
-/// samples stand. Does not own the file; what is written to it meanwhile is not seen.
+/// Keeps two pieces of the file: its start, and what was last read elsewhere, which is where the chunks after the
+/// samples lie. Does not own the file, and does not see later writes to it.
 class HeaderWindow {
 public:
-    /// What at() can be asked for.
+    /// The most bytes that at() gives.
     static constexpr std::size_t kMostAtOnce = 2048;
 
-    /// `length` is that of the file, asked for once.
+    /// `length` is that of the file, in bytes.
     HeaderWindow(const ByteSource& file, std::uint64_t length) : file_(file), length_(length) {}
 
-    /// From now on nothing is read: a read of what is not held fails.
+    /// Stops reading: from now on, bytes that are not held fail.
     void seal() { isSealed_ = true; }
 
+    /// In bytes, as given.
     std::uint64_t length() const { return length_; }
-    /// That of the first read that failed; kStatusOK until then. A file whose bytes cannot be read has not ended.
+    /// The status of the first read that failed, else kStatusOK. It tells a file that cannot be read from one that
+    /// ends.
     std::int32_t failure() const { return failure_; }
-    /// Why at() gave nothing, or read() not all, the last time: kStatusEndOfFile, or that of the read that failed.
+    /// Why at() last gave nothing, or read() not all: kStatusEndOfFile, or the status of the read that failed.
     std::int32_t reason() const { return reason_; }
 
-    /// `count` bytes at `position`, there until the next call; null when the file ends ahead of them, and when they
+    /// `count` bytes at `position`, valid until the next call. Null when the file ends ahead of them, and when they
     /// cannot be read.
     const std::byte* at(std::uint64_t position, std::size_t count)
     {
@@ -41,14 +43,15 @@ public:
         return isAtStart ? start_.at(*this, 0, position, count) : elsewhere_.at(*this, position, position, count);
     }
 
-    /// The same of what was read already; null when it was not.
+    /// The same, but only of bytes that were read already; null for others.
     const std::byte* held(std::uint64_t position, std::size_t count) const
     {
         const std::byte* found = start_.find(position, count);
         return found != nullptr ? found : elsewhere_.find(position, count);
     }
 
-    /// Copies as many of the bytes as are there, and returns their number: fewer at the file's end, and on a failure.
+    /// Copies as many of the bytes as there are, and returns their number: fewer at the end of the file and on
+    /// failure.
     std::size_t readSome(void* to, std::uint64_t position, std::size_t count)
     {
         reason_ = kStatusEndOfFile;
@@ -65,12 +68,12 @@ public:
         return done;
     }
 
-    /// All of the bytes; kStatusEndOfFile when they are not all there; else the status of the read that failed.
+    /// Copies all of the bytes. kStatusEndOfFile when they are not all there, else the status of the failed read.
     std::int32_t read(void* to, std::uint64_t position, std::size_t count)
     {
         return readSome(to, position, count) == count ? std::int32_t{kStatusOK} : reason_;
     }
-    /// A record, which is not touched when it cannot be had; reason() then says why.
+    /// Copies a record; false, and the record untouched, when it cannot be read: reason() says why.
     template <class Record>
     bool get(Record& record, std::uint64_t position)
     {

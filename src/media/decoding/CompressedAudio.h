@@ -1,5 +1,5 @@
-// What audio files say of themselves that stand in none of the library's containers: MP3, AAC, M4A, and whatever else
-// the decoder module reads.
+// Descriptions of audio files outside the library's containers: MP3, AAC, M4A, and whatever else the decoder module
+// reads.
 #pragma once
 
 #include "media/packets/FileEnds.h"
@@ -10,20 +10,18 @@
 
 namespace platform {
 
-/// Where the library finds the packets itself, in MP3, ADTS, MP4 and CAF files, and knows their frames exactly: the
-/// decoder module is not asked. AudioHandle::kFormatNotSupported elsewhere; kStatusIOError for a file of these that is
-/// broken.
+/// Describes MP3, ADTS, MP4 and CAF files, whose packets the library finds and counts exactly without the decoder
+/// module. AudioHandle::kFormatNotSupported for other files; kStatusIOError for a broken one of these.
 std::int32_t describePackets(const URL& url, CompressedAudio& audio);
 
-/// What decoding gives, by the decoder module, of a file that begins as one of `fileType`, which becomes what the
-/// module says. AudioHandle::kFormatNotSupported for one that the module does not decode, or would and is not there.
+/// Describes what the decoder module gives for a file that begins as one of `fileType`, which becomes what the module
+/// says. AudioHandle::kFormatNotSupported when the module does not decode it or is not installed.
 std::int32_t describeByDecoding(const URL& url, FourCC fileType, CompressedAudio& audio);
 
-/// `start` are the file's first bytes, 16 where it has so many. MP3, AAC of more than 24 kHz and M4A are described
-/// without the decoder module, and so are files whose ends prove how long they are (FileEnds.h); it is loaded for none
-/// but files that begin as one of its kinds does.
-/// kStatusParameterError for a file that is none of these; AudioHandle::kFormatNotSupported, with `audio.fileType` set,
-/// for one that the module does not decode, or would and is not there.
+/// Describes a file by its first bytes `start`, 16 where it has so many. MP3, AAC of more than 24 kHz, M4A, and files
+/// whose ends prove how long they are (FileEnds.h) need no decoder module; it is loaded only for files that begin as
+/// one of its kinds. kStatusParameterError for a file that is none of these; AudioHandle::kFormatNotSupported, with
+/// `audio.fileType` set, when the module does not decode it or is not installed.
 std::int32_t describeCompressedAudio(const URL& url, BytesView start, CompressedAudio& audio);
 
 } // namespace platform

@@ -1,4 +1,4 @@
-// Loudness and true peak of sound, as EBU R 128 has programmes measured (ITU-R BS.1770-4, EBU Tech 3341 and 3342).
+// Loudness and true peak of sound by EBU R 128 (ITU-R BS.1770-4, EBU Tech 3341 and 3342).
 #pragma once
 
 #include "platform/core/Error.h"
@@ -11,7 +11,7 @@
 
 namespace platform {
 
-/// None of what has no number: of silence, and of sound that is too short for it.
+/// The measures of a sound. A value without a number is null: for silence, and for sound that is too short for it.
 struct Loudness {
     std::optional<double> integrated;   ///< of all but the quiet parts (gated), in LUFS; of 400 ms at least
     std::optional<double> range;        ///< in LU, by the short-term loudness of each 100 ms; of 3 s at least
@@ -20,15 +20,18 @@ struct Loudness {
     std::optional<double> maxShortTerm; ///< of any 3 s, the same way
 };
 
-/// Measures what is added, piece by piece.
+/// Measures sound that is added in pieces.
 class LoudnessMeter {
 public:
-    static constexpr std::uint32_t kMostChannels = 64, kLowestRate = 16, kHighestRate = 2'822'400;
+    static constexpr std::uint32_t kMostChannels = 64, // of one sound
+        kLowestRate = 16,                              // in Hz
+        kHighestRate = 2'822'400;                      // in Hz
 
     virtual ~LoudnessMeter() = default;
-    /// Interleaved frames, full scale being 1. kStatusOK, kStatusOutOfMemory, or kStatusParameterError of samples that
-    /// are no numbers, after which nothing is measured.
+    /// Adds interleaved frames, full scale being 1. kStatusOK, kStatusOutOfMemory, or kStatusParameterError for
+    /// samples that are not numbers, after which nothing is measured.
     virtual std::int32_t add(const float* samples, std::size_t frames) = 0;
+    /// The measures of everything added so far.
     virtual Loudness measured() const = 0;
 };
 
@@ -42,12 +45,12 @@ KT_EXPORT std::unique_ptr<LoudnessMeter> makeLoudnessMeter(std::uint32_t channel
                                                            std::uint32_t speakers, std::int32_t& status,
                                                            Error* error = nullptr);
 
-/// What the module exports as "ktfiles_loudnessModule". Its function throws nothing; null: out of memory.
+/// What the module exports as "ktfiles_loudnessModule". Its function throws nothing; null means out of memory.
 struct LoudnessModule {
     static constexpr std::uint32_t currentVersion = 1; // of this struct and of the meter; another is not used
 
-    std::uint32_t version;
-    /// `speakers` has one for each channel.
+    std::uint32_t version; // as currentVersion when the module was built
+    /// Makes a meter; `speakers` has a bit for each channel.
     LoudnessMeter* (*make)(std::uint32_t channels, std::uint32_t sampleRate, std::uint32_t speakers);
 };
 

@@ -1,4 +1,4 @@
-// The lowest and the highest of samples as they stand in files: what a picture of them is made of.
+// The lowest and highest of stored samples, from which a picture of them is made.
 #pragma once
 
 #include "media/samples/SampleConversion.h"
@@ -7,19 +7,19 @@
 
 namespace platform {
 
-/// Of a run of samples, those at even places and those at odd places apart: of stereo, left and right. Zero counts as
-/// one of each. A sample is the float that samplesToFloat makes of it; a NaN counts as nothing.
+/// The extremes of a run of samples, apart for even and odd places: for stereo, left and right. Zero always counts
+/// among them. A sample is the float that samplesToFloat makes of it; a NaN does not count.
 struct SampleExtremes {
-    float lowest[2] = {0, 0};
-    float highest[2] = {0, 0};
+    float lowest[2] = {0, 0};  // at most 0
+    float highest[2] = {0, 0}; // at least 0
 };
 
-/// The extremes of `runs` runs that follow each other, each of `samplesPerRun` samples, to `to`. `samples` needs no
+/// The extremes of `runs` consecutive runs of `samplesPerRun` samples each, written to `to`. `samples` needs no
 /// alignment. The format must be supported.
 KT_EXPORT void sampleExtremes(const void* samples, SampleFormat format, std::size_t samplesPerRun, std::size_t runs,
                               SampleExtremes* to);
 
-/// The plain road, without vector instructions: what the fast one is proven equal to.
+/// The same without vector instructions, which the fast one must equal.
 KT_EXPORT void sampleExtremesPlain(const void* samples, SampleFormat format, std::size_t samplesPerRun,
                                    std::size_t runs, SampleExtremes* to);
 

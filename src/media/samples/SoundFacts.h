@@ -1,11 +1,11 @@
-// What a file says of its sound beside how it is coded.
+// What a file says about its sound besides its coding.
 #pragma once
 
 #include <cstdint>
 
 namespace platform {
 
-/// The kinds of a coding that decoders of it tell apart: of AAC the audio object types of ISO/IEC 14496-3.
+/// The kinds of a coding that its decoders tell apart; for AAC the audio object types of ISO/IEC 14496-3.
 enum class CodingProfile : std::int32_t {
     unknown = 0,
     aacMain = 1,
@@ -24,15 +24,17 @@ enum class CodingProfile : std::int32_t {
     dtsExpress = 0x104,
 };
 
+/// What a file says about its sound besides its coding.
 struct SoundFacts {
-    /// Which speakers the channels feed, as bits of the channel mask of extensible WAVE; 0 when the file does not say.
+    /// The speakers that the channels feed, as bits of the channel mask of extensible WAVE; 0 when the file does not
+    /// say.
     std::uint32_t speakers = 0;
-    CodingProfile profile = CodingProfile::unknown;
-    /// Tracks of audio, of which the first is the one that is described and decoded.
+    CodingProfile profile = CodingProfile::unknown; // of the coding
+    /// How many audio tracks there are; the first is described and decoded.
     std::uint32_t tracks = 1;
-    /// Frames that the headers promise; 0 where they promise none. A file with fewer is not whole.
+    /// How many frames the headers promise; 0 where they promise none. A file with fewer is not whole.
     std::uint64_t promisedFrames = 0;
-    /// Of 1-bit sound (DSD), which decodes to PCM of another rate: its own rate in hertz; else 0.
+    /// For 1-bit sound (DSD), which decodes to PCM of another rate: its own rate in hertz; else 0.
     std::uint64_t bitstreamRate = 0;
 };
 

@@ -79,8 +79,9 @@ FileProblem CCoordinatedEdit::Begin(const std::string& path, CoordinatedEditOpti
     if (error)
         return {FileProblem::Kind::system, error.value()};
     const platform::CoordinatedItem item(platform::URL::createWithFileSystemBytes(target, false));
-    if (FileProblem problem = takeAccess(item, options, access_))
-        return problem;
+    if (!options.hasAccess)
+        if (FileProblem problem = takeAccess(item, options, access_))
+            return problem;
     if (options.timeoutSeconds && !options.waitForLock)
         options.waitForLock = [seconds = *options.timeoutSeconds](int descriptor, const std::string&) {
             return waitForLock(descriptor, seconds);

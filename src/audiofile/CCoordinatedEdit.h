@@ -15,6 +15,8 @@ class CoordinatedAccess;
 struct CoordinatedEditOptions : SafeEditOptions {
     /// How many seconds to wait for others, each time that they are in the way; 0 or more. Null means no limit.
     std::optional<double> timeoutSeconds = std::nullopt;
+    /// The caller has coordinated write access already, for which the edit would wait.
+    bool hasAccess = false;
 };
 
 /// One edit of one file. From Begin to its destruction nobody else has coordinated access to the file, and it is

@@ -25,6 +25,8 @@ foreach(room platform/core platform files loops/tagging audiofile audiofile/fiel
     file(GLOB headers CONFIGURE_DEPENDS ${PROJECT_SOURCE_DIR}/src/${room}/*.h)
     install(FILES ${headers} DESTINATION ${CMAKE_INSTALL_INCLUDEDIR}/KTFiles/${room} COMPONENT development)
 endforeach()
+# The interface for C has a name of its own in front of the rooms.
+install(FILES ${PROJECT_SOURCE_DIR}/c/ktfiles.h DESTINATION ${CMAKE_INSTALL_INCLUDEDIR} COMPONENT development)
 # Of what knows sound, the services and the types that they speak in; the test house.arrows reads this list too.
 set(media_headers
     media/samples/SampleConversion.h media/samples/SampleExtremes.h media/samples/SoundFacts.h

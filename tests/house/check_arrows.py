@@ -37,6 +37,8 @@ ARROWS = {
 }
 # Of the command, the one source that knows the parser of its command line.
 PARSER, PARSER_USER = "<CLI/", "tool/shared/arguments/Verb.cpp"
+# What C programs include, and what that may include.
+C_HEADER, C_HEADER_INCLUDES = "c/ktfiles.h", {"<stddef.h>", "<stdint.h>"}
 # Members that a room above their class's own defines: overviews and tempo are none of a container's business.
 MEMBERS_ABOVE = {("CAudioFileIO", "loops"), ("CAudioFileIO", "loops/overview")}
 CLASS = re.compile(r"^(?:class|struct)\s+(?:KT_EXPORT\s+)?(\w+)(?:\s+final)?\s*(?::[^;{]*)?\{", re.MULTILINE)
@@ -132,6 +134,20 @@ def tool_problems(source, top, public):
             yield f"{relative}: {ours} is no public header"
 
 
+def binding_problems(source, top, public):
+    """The interface for C knows the public headers and its own folder; what it shows to hosts knows the C library alone."""
+    relative = source.relative_to(top).as_posix()
+    shown = relative == C_HEADER
+    for ours, system in INCLUDE.findall(source.read_text(encoding="utf-8")):
+        if ours.startswith("c/") and not shown:
+            if not (top / ours).exists():
+                yield f"{relative}: there is no {ours}"
+        elif ours and (shown or ours not in public):
+            yield f"{relative}: {ours} is no public header"
+        elif shown and system not in C_HEADER_INCLUDES:
+            yield f"{relative}: includes {system}"
+
+
 def main():
     top = pathlib.Path(sys.argv[1])
     root = top / "src"
@@ -154,6 +170,13 @@ def main():
         for source in sorted([*(top / folder).rglob("*.h"), *(top / folder).rglob("*.cpp")]):
             count += 1
             problems += tool_problems(source, top, public)
+    for source in sorted([*(top / "c").rglob("*.h"), *(top / "c").rglob("*.cpp")]):
+        count += 1
+        problems += binding_problems(source, top, public)
+    for source in sorted((top / "examples").rglob("*.c")):
+        count += 1
+        problems += [f"{source.name}: {ours} is not what C programs include"
+                     for ours, _ in INCLUDE.findall(source.read_text(encoding="utf-8")) if ours]
     problems += [f"cmake/Install.cmake: {header} is not there" for header in media if not (root / header).exists()]
     if count == 0:
         problems.append("no sources found")

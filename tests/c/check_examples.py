@@ -1,0 +1,66 @@
+"""Runs the examples in C, and types what the guide for C shows.
+
+Usage: check_examples.py SOURCE_ROOT FOLDER_OF_PROGRAMS
+"""
+import pathlib
+import re
+import shlex
+import shutil
+import subprocess
+import sys
+import tempfile
+import unittest
+import wave
+
+ROOT, PROGRAMS = (pathlib.Path(argument).resolve() for argument in sys.argv[1:3])
+PAGE = (ROOT / "docs" / "guide" / "from-c.md").read_text(encoding="utf-8")
+
+
+class Examples(unittest.TestCase):
+    def setUp(self):
+        self.folder = pathlib.Path(tempfile.mkdtemp())
+        self.addCleanup(shutil.rmtree, self.folder)
+        for file in (ROOT / "examples" / "media").iterdir():
+            if file.is_file():
+                shutil.copy(file, self.folder)
+
+    def run_program(self, name, *arguments, status=0):
+        done = subprocess.run([PROGRAMS / name, *arguments], cwd=self.folder, capture_output=True, text=True, check=False)
+        self.assertEqual(done.returncode, status, done.stderr)
+        return done.stdout + done.stderr
+
+    def test_the_page_shows_the_programs(self):
+        shown = re.findall(r"<!-- (\S+) -->\n```c\n(.*?)```", PAGE, re.DOTALL)
+        self.assertTrue(shown)
+        for path, text in shown:
+            self.assertEqual(text, (ROOT / path).read_text(encoding="utf-8"), path)
+
+    def test_the_page_shows_what_they_print(self):
+        shown = re.findall(r"```console\n(.*?)```", PAGE, re.DOTALL)
+        self.assertTrue(shown)
+        for block in shown:
+            for command, output in re.findall(r"\$ \./([^\n]*)\n([^$]*)", block):
+                self.assertEqual(self.run_program(*shlex.split(command)), output, command)
+
+    def test_fragments_of_the_page_name_what_there_is(self):
+        header = (ROOT / "c" / "ktfiles.h").read_text(encoding="utf-8")
+        for name in set(re.findall(r"\b(?:ktf|KTF)_\w+", PAGE)):
+            self.assertRegex(header, rf"\b{name}\b")
+
+    def test_samples(self):
+        with wave.open(str(self.folder / "tone-16.wav")) as file:
+            self.assertEqual((file.getnchannels(), file.getsampwidth()), (1, 2))
+            rate, wanted = file.getframerate(), file.readframes(file.getnframes())
+        self.run_program("to_pcm", "tone-16.wav", "out.pcm")
+        self.assertEqual((self.folder / "out.pcm").read_bytes(), wanted)
+        self.run_program("to_pcm", "tone-16.wav", "out.pcm", str(rate), "2")
+        both = b"".join(2 * wanted[at : at + 2] for at in range(0, len(wanted), 2))
+        self.assertEqual((self.folder / "out.pcm").read_bytes(), both)
+
+    def test_failures(self):
+        self.assertEqual(self.run_program("describe", "nothing.wav", status=1), "nothing.wav: file not found\n")
+        self.assertEqual(self.run_program("to_pcm", "nothing.wav", "out.pcm", status=1), "nothing.wav: file not found\n")
+        self.assertFalse((self.folder / "out.pcm").exists())
+
+
+unittest.main(argv=sys.argv[:1])

@@ -24,7 +24,7 @@ test-arm64 test-s390x:
 
 # How the sources are laid out, and what clang-tidy finds in them.
 check:
-	@scripts/setup build test bench check
+	@scripts/setup build test python bench check
 	@cmake --preset test -B build/check -D KTFILES_UNITY=OFF $(CMAKE_FLAGS) >/dev/null
 	find . -path ./build -prune -o -name '*.cpp' -print -o -name '*.h' -print | xargs clang-format-14 --dry-run --Werror
 	scripts/tidy build/check
@@ -48,8 +48,8 @@ install: all
 	cmake --install build/release --prefix $(PREFIX)
 
 package:
-	@scripts/setup build package
-	@scripts/build release
+	@scripts/setup build python package
+	@CMAKE_FLAGS="$(CMAKE_FLAGS) -DKTFILES_PYTHON=ON" scripts/build release
 	cd build/release && cpack -G DEB
 	@ls -l build/release/*.deb
 

@@ -1,4 +1,4 @@
-# `cpack -G DEB`: libktfiles0, libktfiles-dev, ktfiles, libktfiles-ffmpeg, libktfiles-taglib and libktfiles-ebur128 where
+# `cpack -G DEB`: libktfiles0, libktfiles-dev, ktfiles; libktfiles-ffmpeg, libktfiles-taglib, libktfiles-ebur128 and python3-ktfiles where
 # their modules are built.
 
 set(CPACK_PACKAGE_NAME ktfiles)
@@ -47,6 +47,17 @@ if(TARGET ktfiles_loudness)
     set(CPACK_COMPONENT_LOUDNESS_DESCRIPTION "Measuring loudness by EBU R 128 for the shared library")
 endif()
 list(JOIN recommended ", " CPACK_DEBIAN_RUNTIME_PACKAGE_RECOMMENDS)
+
+if(TARGET ktfiles_python)
+    list(APPEND CPACK_COMPONENTS_ALL python)
+    set(CPACK_DEBIAN_PYTHON_PACKAGE_NAME python3-ktfiles)
+    set(CPACK_DEBIAN_PYTHON_PACKAGE_SECTION python)
+    # The compiled part is of one version of Python, whose name Debian's python3 has an interval for.
+    math(EXPR next_minor "${KTFILES_PYTHON_MINOR} + 1")
+    set(CPACK_DEBIAN_PYTHON_PACKAGE_DEPENDS 
+        "libktfiles${PROJECT_VERSION_MAJOR} (= ${PROJECT_VERSION}), python3 (>= 3.${KTFILES_PYTHON_MINOR}~), python3 (<< 3.${next_minor}), python3-numpy")
+    set(CPACK_COMPONENT_PYTHON_DESCRIPTION "The Python package ktfiles")
+endif()
 
 set(CPACK_DEBIAN_DEVELOPMENT_PACKAGE_NAME libktfiles-dev)
 set(CPACK_DEBIAN_DEVELOPMENT_PACKAGE_SECTION libdevel)

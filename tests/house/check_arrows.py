@@ -130,6 +130,9 @@ def tool_problems(source, top, public):
                 yield f"{relative}: {ours} belongs to another verb"
             elif not (top / ours).exists():
                 yield f"{relative}: there is no {ours}"
+        elif ours.startswith("binding/") and relative.startswith("python/"):
+            if not (top / "python" / ours).exists():
+                yield f"{relative}: there is no {ours}"
         elif ours and ours not in public:
             yield f"{relative}: {ours} is no public header"
 
@@ -166,7 +169,7 @@ def main():
         if not room.startswith("media/")
         for header in (root / room).glob("*.h")
     }
-    for folder in ("tool", "examples"):
+    for folder in ("tool", "python", "examples"):
         for source in sorted([*(top / folder).rglob("*.h"), *(top / folder).rglob("*.cpp")]):
             count += 1
             problems += tool_problems(source, top, public)

@@ -73,16 +73,16 @@ std::int32_t ContainerEditor::findEnd(FileWindow& window, ContainerEnd& end)
 }
 
 /// Appends a chunk to RIFF and its kin or to FORM. All sizes are computed first, so a container that cannot state them
-/// is refused before anything is written. Then, each step with the bytes of the one before on their way to the file:
+/// is refused before anything is written. Then, in this order:
 ///
 /// 1. Only if an RF64 file becomes RIFF: sizes that stood in the "ds64" go into the chunks' own headers. The header
-/// still says RF64, and a reader takes a size field that is not 0xFFFFFFFF as it stands: the chunks are the same.
-/// 2. Only if the size of the last chunk does not lead to the place of the new one: that size is corrected. The chunk
-/// ends where its bytes end; in RF64 a size in the "ds64" follows with step 4.
+///    still says RF64, and a reader takes a size field that is not 0xFFFFFFFF as it stands: the chunks are the same.
+/// 2. Only if the size of the last chunk does not lead to the place of the new one: that size is corrected, so that the
+///    chunk ends where its bytes end. In RF64 a size in the "ds64" follows with step 4.
 /// 3. The new chunk, with its pad byte, goes behind the end that the container states. Readers that go by the
-/// container's size do not look there.
-/// 4. The container's header, in one write, counts the chunk; where sizes pass 4 GiB it is the same write that turns
-/// RIFF into RF64, and back.
+///    container's size do not look there.
+/// 4. The container's header, in one write, counts the chunk. The same write turns RIFF into RF64 where a size passes 4
+///    GiB, and back where none does any more.
 ///
 /// A process that dies after 1 or 2 leaves the old chunks, which the next edit finds as if nothing had happened. After
 /// any part of 3 the container is the old one too, with bytes behind it that nobody counts; the next append finds the

@@ -122,12 +122,11 @@ std::int32_t writeCAF(CAudioFileIO& file, const KTMem& overview, bool& stored)
         return found;
     if (const std::int32_t status = file.PrepareToAppend(); status != kStatusOK)
         return status;
-    if (const std::int32_t status = addCAFOverview(file, chunk);
-        // The new overview is complete before the old one goes: until then a file that is cut short has the old one
-        // first, which is the one that readers find, and perhaps part of a chunk at its end.
-        status != kStatusOK)
+    // The new overview is complete before the old one goes. Until then the old one stands first, where readers find it;
+    // a process that dies in between leaves both, or part of a chunk at the end of the file.
+    if (const std::int32_t status = addCAFOverview(file, chunk); status != kStatusOK)
         return status;
-    const std::int32_t removed = removeCAFOverviews(file, 1); // the old one goes last, having been found until now
+    const std::int32_t removed = removeCAFOverviews(file, 1);
     stored = removed == kStatusOK;
     return removed;
 }

@@ -204,14 +204,14 @@ std::optional<std::int32_t> UserDataEditor::placeAtEnd(std::size_t hiddenFrom, c
 ///
 /// 1. mergeFiller: one header makes the run a single filler. The chunks are the same.
 /// 2. The body of the first chunk, the further chunks and the header of the filler that will follow them are written
-/// inside that filler, where nobody looks: it still has its own header.
+///    inside that filler, where nobody looks: it still has its own header.
 /// 3. A flush, so that the next write cannot reach the disk ahead of these.
 /// 4. One header, 8 bytes (CAF: 12), turns the filler into the first chunk. From here on readers walk from it to the
-/// next one and on to the new filler, which ends at `hiddenEnd` and so hides the chunks up to there.
+///    next one and on to the new filler, which ends at `hiddenEnd` and so hides the chunks up to there.
 ///
 /// A process that dies before 4 leaves the old chunks and filler, which the next edit overwrites; after 4 it leaves the
-/// new ones. finish() only cuts filler off at the end. A header that is written in part is put back by
-/// FileBytes::overwrite.
+/// new ones. finish() only cuts filler off at the end. If the write of the header fails in part, FileBytes::overwrite
+/// puts the old bytes back.
 std::optional<std::int32_t> UserDataEditor::fillFront(const Run& filler, std::uint64_t hiddenEnd,
                                                       const Content& content)
 {
@@ -284,8 +284,8 @@ std::optional<std::int32_t> UserDataEditor::fillBehind(std::uint64_t hiddenFrom,
 /// whole or absent:
 ///
 /// 1. The new chunk is added as near behind the old one as there is room. Between the two steps both are there, the old
-/// one first: readers that take the first of a type see the old one. If other chunks of the type stand between, copies
-/// of them are added behind the new one, so that no index changes in the end.
+///    one first: readers that take the first of a type see the old one. If other chunks of the type stand between,
+///    copies of them are added behind the new one, so that no index changes in the end.
 /// 2. hideOld makes filler of the old ones, the last one first.
 ///
 /// A process that dies after 1 leaves the old chunk under its index, and the new one as one more of its type, behind

@@ -63,11 +63,11 @@ void ItemAccess::acquireForWriting(bool mayGoFirst)
 /// 3. Questions to the presenters, without the ticket, so that readers that come meanwhile get through.
 /// 4. The data byte, for which a ticket holds back new readers again. The asking byte falls, then the ticket.
 /// 5. One more look for presenters. If there is a new one, the asking byte is taken again, the data byte is released,
-/// and 3 follows; otherwise access begins.
+///    and 3 follows; otherwise access begins.
 ///
-/// While the queue is ours, no other writer can acquire a lock that it presents, so an agreement from 3 stays valid
-/// until 5. A process that is killed at any step leaves nothing behind: its tickets and bytes fall, the next waiter
-/// wakes, and the presenters find the connection closed and forget the question.
+/// While the queue is ours, nobody else comes to hold the item for longer, except by answering us later, so an
+/// agreement from 3 stays valid until 5. A process that is killed at any step leaves nothing behind: its tickets and
+/// bytes fall, the next waiter wakes, and the presenters find the connection closed and forget the question.
 void ItemAccess::acquireInQueue()
 {
     const ByteRange turn = window_.range(kQueueByte, 2);

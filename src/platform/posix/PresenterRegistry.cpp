@@ -183,12 +183,12 @@ void PresenterRegistry::change(Registration& registration, AskedBy askedBy, std:
 /// this order:
 ///
 /// 1. moveHome: a slot, its listening socket and the thread that answers. Nobody looks there yet. If the folder in
-/// force changed, everything that is raised already is raised in the new one before the old home retires, so that an
-/// item is never without its presence in both.
+///    force changed, everything that is raised already is raised in the new one before the old home retires, so that an
+///    item always has its presence in one of them.
 /// 2. Home::raise: an exclusive lock on the presence byte. From here on whoever looks asks. The socket listened first,
-/// so an asker that sees the byte always reaches somebody.
+///    so an asker that sees the byte always reaches somebody.
 /// 3. A look whether the folder of the lock is still the one in force. If it was deleted in between, the lock is in a
-/// file that nobody opens any more, and all begins again in the new folder.
+///    file that nobody opens any more, and all begins again in the new folder.
 ///
 /// Only then is the presence counted. A process that dies after 1 leaves a socket at which nobody listens, which the
 /// next owner of the slot replaces; after 2 its byte falls with it, and askers that found nobody listening wait for

@@ -21,11 +21,11 @@ FileProblem refusal(std::int32_t status)
     return {.kind = FileProblem::Kind::refused, .status = status};
 }
 
-/// Runs `wait`, which may block, on another thread; false when the time is up, or when there is no thread. It then goes
-/// on there: it owns what it uses.
+/// Runs `wait`, which may block, on another thread; false on a timeout, or if no thread can be started. After a timeout
+/// it continues there, so it must own what it uses.
 bool isDoneWithin(double seconds, std::function<void()> wait)
 {
-    constexpr double least = 0.1, most = 1e8; // even what is free takes a moment to be had
+    constexpr double least = 0.1, most = 1e8; // even what is free takes a moment to be acquired
     const auto task = std::make_shared<std::packaged_task<void()>>(std::move(wait));
     std::future<void> done = task->get_future();
     return platform::runInBackground([task] { (*task)(); }) &&
@@ -57,8 +57,8 @@ FileProblem takeAccess(const platform::CoordinatedItem& item, const CoordinatedE
     return access != nullptr ? FileProblem() : refusal(NSErrorToOSErr(&opening->error));
 }
 
-/// For a lock on the open file, which another edit has. The lock is the open file's: had too late, it goes with the
-/// last of its descriptors, which is the copy.
+/// Waits for a lock on the open file, which another edit holds. The lock belongs to the open file: if it is acquired
+/// too late, it is released with the last descriptor, the copy.
 std::int32_t waitForLock(int descriptor, double seconds)
 {
     const auto copy = std::make_shared<platform::OwnedDescriptor>(::fcntl(descriptor, F_DUPFD_CLOEXEC, 0));

@@ -1,4 +1,4 @@
-// How fields of AIFF and AIFC are set.
+// Sets fields of AIFF and AIFC.
 #include "audiofile/metadata/AIFFInstrumentChunk.h"
 #include "audiofile/metadata/CommentList.h"
 #include "audiofile/metadata/MarkerList.h"
@@ -21,7 +21,7 @@ Bytes asBytes(const std::string& text)
     return {bytesOf(text).begin(), bytesOf(text).end()};
 }
 
-/// The whole chunk is the text.
+/// For chunks that are a text as a whole.
 template <FourCC id>
 void setText(MetaEdit& edit, const MetaStep& step)
 {
@@ -47,7 +47,7 @@ void setText(MetaEdit& edit, const MetaStep& step)
 
 // "comt":
 
-/// A list without items, and with nothing behind them, goes.
+/// Removes a list without items and without bytes after them.
 template <class List>
 void putOrRemove(MetaEdit& edit, FourCC id, const List& list, bool isEmpty)
 {
@@ -162,7 +162,7 @@ void setMarkerPosition(MetaEdit& edit, const MetaStep& step)
     });
 }
 
-/// Comments and the loops of "INST" that name a marker `from` name `to`; 0: none, and a loop is none then.
+/// Comments and "INST" loops with marker `from` get marker `to`; 0 means none, and removes the loop.
 void renameMarker(MetaEdit& edit, std::int16_t from, std::int16_t to)
 {
     if (edit.find(kCommentList) != nullptr) {

@@ -1,4 +1,4 @@
-// How fields of "bext" are set.
+// Sets fields of "bext".
 #include "audiofile/metadata/BroadcastExtension.h"
 #include "tool/meta/ChunkFields.h"
 #include "tool/meta/MetaEdit.h"
@@ -13,7 +13,7 @@ namespace {
 
 constexpr FourCC kBext = fourCC("bext");
 
-/// A file that has no such chunk yet gets one of version 1.
+/// Creates a chunk of version 1 if the file has none.
 template <class Change>
 void changeBext(MetaEdit& edit, const MetaStep& step, Change change)
 {
@@ -34,7 +34,7 @@ constexpr std::array kLoudness{&BroadcastExtension::loudnessValue, &BroadcastExt
 constexpr std::array<std::string_view, kLoudness.size()> kLoudnessNames{
     "loudnessValue", "loudnessRange", "maxTruePeakLevel", "maxMomentaryLoudness", "maxShortTermLoudness"};
 
-/// Where fields were reserved bytes, which are zero, they are told to be unknown.
+/// Fields that were reserved bytes, and so are zero, become "unknown".
 void raiseVersion(BroadcastExtension& bext, std::uint16_t version)
 {
     const bool isNew =
@@ -45,7 +45,7 @@ void raiseVersion(BroadcastExtension& bext, std::uint16_t version)
     bext.version = version;
 }
 
-/// Raised for a field that it does not have, unless it is named.
+/// Raises the version for a field that the present one lacks, unless the version itself is set.
 void requireVersion(const MetaEdit& edit, const MetaStep& step, BroadcastExtension& bext, std::uint16_t version)
 {
     if (bext.version >= version)
@@ -56,7 +56,7 @@ void requireVersion(const MetaEdit& edit, const MetaStep& step, BroadcastExtensi
     raiseVersion(bext, version);
 }
 
-/// A lower version has reserved bytes where fields were: they must be empty, or be named as well.
+/// A lower version reserves bytes that were fields: these must be empty, or be set as well.
 void setVersion(MetaEdit& edit, const MetaStep& step)
 {
     changeBext(edit, step, [&](BroadcastExtension& bext) {
@@ -111,7 +111,7 @@ void setTimeReference(MetaEdit& edit, const MetaStep& step)
 
 constexpr std::string_view kLineEnd = "\r\n";
 
-/// Lines as the standard ends them.
+/// Ends lines as the standard requires.
 std::string withLineEnds(std::string_view text)
 {
     std::string lines;
@@ -130,7 +130,7 @@ void setHistory(MetaEdit& edit, const MetaStep& step)
                [&](BroadcastExtension& bext) { replaceText(bext.codingHistory, withLineEnds(step.string())); });
 }
 
-/// One line, counted as they are shown: those that are not empty. The others keep their ends, whatever those are.
+/// Sets one line, counted as shown, without empty lines. Other lines keep their line ends.
 void setHistoryLine(MetaEdit& edit, const MetaStep& step)
 {
     changeBext(edit, step, [&](BroadcastExtension& bext) {

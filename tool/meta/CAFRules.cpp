@@ -1,4 +1,4 @@
-// How fields of CAF are set.
+// Sets fields of CAF.
 #include "audiofile/metadata/CAFMarkers.h"
 #include "audiofile/metadata/CAFStringTable.h"
 #include "audiofile/metadata/CAFTextPairs.h"
@@ -16,9 +16,9 @@ namespace {
 
 constexpr FourCC kInfo = fourCC("info"), kStrings = fourCC("strg"), kCAFMarkers = fourCC("mark");
 
-// "info":
+// "info".
 
-// Those of the published format description.
+// Keys of the published format description.
 constexpr std::array<std::string_view, 19> kKeys{"tempo",
                                                  "key signature",
                                                  "time signature",
@@ -64,7 +64,7 @@ void setCAFInfo(MetaEdit& edit, const MetaStep& step)
         edit.add(kInfo, texts.payload());
 }
 
-// "strg" and "mark":
+// "strg" and "mark".
 
 CAFStringTable stringsOf(MetaEdit& edit)
 {
@@ -88,7 +88,7 @@ std::uint32_t freeTextId(MetaEdit& edit, const CAFStringTable& table)
     return most + 1;
 }
 
-/// In the place of the entry's text where it fits and no other entry looks into it; else behind all texts.
+/// Replaces the entry's text in place if it fits and no other entry shares it; otherwise appends it after all texts.
 void setTextOf(CAFStringTable& table, CAFStringEntry& entry, const std::string& text)
 {
     const std::string old = table.textOf(entry).value_or("");
@@ -98,7 +98,7 @@ void setTextOf(CAFStringTable& table, CAFStringEntry& entry, const std::string& 
                          });
     const auto at = static_cast<std::ptrdiff_t>(begin);
     const bool hasRoom = isAlone && text.size() <= old.size() && at + std::ssize(old) < std::ssize(table.texts);
-    if (!hasRoom && table.missingEntries != 0) // what follows the entries would become one
+    if (!hasRoom && table.missingEntries != 0) // bytes after the entries would become an entry
         MetaEdit::refuseDamaged(kStrings);
     if (isAlone)
         std::fill_n(table.texts.begin() + at, old.size(), std::byte{0});
@@ -163,7 +163,7 @@ void changeCAFMarker(MetaEdit& edit, const MetaStep& step, Change change)
 
 void setCAFPosition(MetaEdit& edit, const MetaStep& step)
 {
-    constexpr std::uint64_t most = std::uint64_t{1} << 53; // of whole numbers in a double
+    constexpr std::uint64_t most = std::uint64_t{1} << 53; // whole numbers that a double can hold
     changeCAFMarker(edit, step, [&](CAFMarkerList&, CAFMarker& marker) {
         const std::uint64_t frames = edit.framesOf(step, most);
         if (edit.file().frames >= 0 && frames > static_cast<std::uint64_t>(edit.file().frames) && !edit.isLenient())
@@ -181,7 +181,7 @@ void setNumber(MetaEdit& edit, const MetaStep& step)
     });
 }
 
-/// A text of its own: one that others have too stays theirs.
+/// Gives the marker a text of its own; a shared text stays with the other markers.
 void setCAFMarkerName(MetaEdit& edit, const MetaStep& step)
 {
     changeCAFMarker(edit, step, [&](CAFMarkerList& list, CAFMarker& marker) {

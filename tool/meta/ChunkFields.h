@@ -1,4 +1,4 @@
-// Members of chunks, and lists in them, as rules set them.
+// Members of chunks and lists in them, for rules.
 #pragma once
 
 #include "audiofile/metadata/FixedText.h"
@@ -8,7 +8,7 @@
 
 #include <type_traits>
 
-/// Its rule knows how long the text may be.
+/// The rule has limited the text's length.
 template <std::size_t size>
 void assign(FixedText<size>& field, const MetaStep& step)
 {
@@ -24,7 +24,7 @@ void assign(Packed<T>& field, const MetaStep& step)
         field = static_cast<T>(step.number());
 }
 
-/// The chunk of an id; an empty one where there is none. Refuses one that is damaged.
+/// The chunk with an id; an empty one if there is none. Refuses a damaged chunk.
 template <class Chunk>
 Chunk valueOf(MetaEdit& edit, FourCC id)
 {
@@ -35,7 +35,7 @@ Chunk valueOf(MetaEdit& edit, FourCC id)
     return *value;
 }
 
-/// In the place of that of its id, or as a new one.
+/// Replaces the chunk with that id, or adds one.
 template <class Chunk>
 void putChunk(MetaEdit& edit, FourCC id, const Chunk& value)
 {
@@ -47,7 +47,7 @@ void putChunk(MetaEdit& edit, FourCC id, const Chunk& value)
 
 constexpr FourCC kListId = fourCC("LIST");
 
-/// A list without items goes.
+/// Removes a list without items.
 template <class List>
 void putList(MetaEdit& edit, MetaChunk* chunk, const List& list)
 {

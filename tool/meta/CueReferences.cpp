@@ -15,7 +15,7 @@ namespace {
 
 constexpr FourCC kCuePoints = fourCC("cue "), kPlaylist = fourCC("plst"), kSampler = fourCC("smpl");
 
-/// Changes each list "adtl"; one without items goes.
+/// Changes each list "adtl", and removes one without items.
 template <class Change>
 void changeLists(MetaEdit& edit, Change change)
 {
@@ -27,7 +27,7 @@ void changeLists(MetaEdit& edit, Change change)
     }
 }
 
-/// The chunks of the id, each read; what is damaged names no point.
+/// Reads each chunk with the id; a damaged one refers to no point.
 template <class Chunk, class Change>
 void changeChunks(MetaEdit& edit, FourCC id, Change change)
 {

@@ -1,4 +1,4 @@
-// How fields of "cue ", and of LIST "adtl", are set.
+// Sets fields of "cue " and of LIST "adtl".
 #include "audiofile/metadata/AssociatedDataList.h"
 #include "audiofile/metadata/CueList.h"
 #include "tool/meta/ChunkFields.h"
@@ -31,7 +31,7 @@ void putCues(MetaEdit& edit, const CueList& cues)
         edit.replace(*chunk, cues.write());
 }
 
-/// The number of "[id 7]", by which `meta` calls a point that "cue " does not have.
+/// The number in "[id 7]", the name that `meta` gives to a point missing in "cue ".
 std::optional<std::uint32_t> idNamedBy(const MetaStep& step)
 {
     const auto id = step.name.parts.front().id();
@@ -39,7 +39,7 @@ std::optional<std::uint32_t> idNamedBy(const MetaStep& step)
                                                                   : std::nullopt;
 }
 
-/// The point that a step is about, made where it is a new one; none of a removal of what is not there.
+/// The point of a step, created if the step says so; none when removing a point that does not exist.
 std::optional<std::size_t> pointOf(MetaEdit& edit, const MetaStep& step, CueList& cues)
 {
     if (const auto id = idNamedBy(step)) {
@@ -59,12 +59,12 @@ std::optional<std::size_t> pointOf(MetaEdit& edit, const MetaStep& step, CueList
     std::uint32_t most = 0;
     for (const CuePoint& point : cues.points)
         most = std::max<std::uint32_t>(most, point.id);
-    cues.points.emplace_back().id = freeCueId(edit, most + 1); // from 0 on where there is none above them
+    cues.points.emplace_back().id = freeCueId(edit, most + 1); // from 0 on if there is none above
     putCues(edit, cues);
     return index;
 }
 
-/// Names and remarks may be of a point that "cue " does not have.
+/// Names and remarks may belong to a point missing in "cue ".
 std::optional<std::uint32_t> cueIdOf(MetaEdit& edit, const MetaStep& step)
 {
     if (const auto id = idNamedBy(step); id && isSpokenOf(edit, *id))
@@ -85,14 +85,14 @@ void setPoint(MetaEdit& edit, const MetaStep& step)
     const bool isTime = std::holds_alternative<MetaTime>(step.value);
     const auto number =
         isTime ? static_cast<std::uint32_t>(edit.framesWithinSound(step)) : static_cast<std::uint32_t>(step.number());
-    // Mostly both say the same, and then go on to.
+    // Both fields usually agree, and then stay equal.
     if (member == &CuePoint::sampleOffset && point.position == point.sampleOffset)
         point.position = number;
     point.*member = number;
     putCues(edit, cues);
 }
 
-/// What is said of a point goes where it goes: of several points of one id that is the first, as `meta` shows it.
+/// What refers to the point follows it: of several points with one id only the first, as `meta` shows it.
 void setPointId(MetaEdit& edit, const MetaStep& step)
 {
     CueList cues = cuesOf(edit);
@@ -115,7 +115,7 @@ void setPointId(MetaEdit& edit, const MetaStep& step)
     putCues(edit, cues);
 }
 
-/// The list that speaks of the point so, else the first.
+/// The list that already describes the point, else the first.
 MetaChunk* listAbout(MetaEdit& edit, FourCC id, std::uint32_t cueId)
 {
     for (std::size_t i = 0;; ++i) {
@@ -180,7 +180,7 @@ void setRange(MetaEdit& edit, const MetaStep& step)
     putList(edit, chunk, list);
 }
 
-/// A range without a length is none.
+/// A range needs a length.
 void setLength(MetaEdit& edit, const MetaStep& step)
 {
     if (!step.isRemoval())
@@ -194,7 +194,7 @@ void setLength(MetaEdit& edit, const MetaStep& step)
     putList(edit, chunk, list);
 }
 
-/// With all that is said of it, unless that is said of a point ahead of it that has the same id.
+/// Removes a point with everything that refers to it, unless an earlier point has the same id.
 void removePoint(MetaEdit& edit, const MetaStep& step)
 {
     CueList cues = cuesOf(edit);
@@ -213,7 +213,7 @@ void removePoint(MetaEdit& edit, const MetaStep& step)
     putCues(edit, cues);
 }
 
-/// All points, with all that is said of them.
+/// Removes all points with everything that refers to them.
 void removeCues(MetaEdit& edit, const MetaStep&)
 {
     for (MetaChunk* chunk = edit.find(kCue); chunk != nullptr; chunk = edit.find(kCue))

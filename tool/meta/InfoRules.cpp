@@ -1,4 +1,4 @@
-// How fields of LIST "INFO" are set.
+// Sets fields of LIST "INFO".
 #include "audiofile/metadata/InfoList.h"
 #include "tool/meta/ChunkFields.h"
 #include "tool/meta/MetaEdit.h"
@@ -10,7 +10,7 @@
 
 namespace {
 
-/// Ids that are in no list of them are taken where they stand already, so that none comes of a slip.
+/// Unregistered ids are accepted only if the file has them already, so that typing errors create none.
 void requireKnown(const MetaEdit& edit, const MetaStep& step, const std::string& id, bool stands)
 {
     std::vector<std::string> names;
@@ -24,7 +24,7 @@ void requireKnown(const MetaEdit& edit, const MetaStep& step, const std::string&
                                  id.size() == sizeof(FourCC) ? " (--lenient writes it)" : "", didYouMean(id, known)));
 }
 
-/// The indices, among the items of the id, of those that `meta` shows: empty texts have no name.
+/// Indices, among the items with the id, of those that `meta` shows: empty texts have no name.
 std::vector<std::size_t> shownItems(const InfoList& list, FourCC id)
 {
     std::vector<std::size_t> shown;
@@ -59,7 +59,7 @@ void setInfo(MetaEdit& edit, const MetaStep& step)
         return;
     }
     requireKnown(edit, step, text, all != 0);
-    const bool isFirst = part.index.empty() && shown.empty(); // an empty one is filled
+    const bool isFirst = part.index.empty() && shown.empty(); // an empty item is filled
     const std::size_t index = isFirst ? 0 : *edit.itemOf(step, 1, shown.size());
     list.setAt(id, isFirst ? 0 : index < shown.size() ? shown[index] : all, step.string());
     putList(edit, chunk, list);

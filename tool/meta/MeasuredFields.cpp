@@ -22,7 +22,7 @@ using platform::Loudness;
 struct LoudnessField {
     const char* name;
     std::optional<double> Loudness::*value;
-    double shortest; // seconds of sound that it takes
+    double shortest; // seconds of sound required
     const char* unit;
 };
 constexpr std::array kLoudnessFields{LoudnessField{"bext.loudnessValue", &Loudness::integrated, 0.4, "LUFS"},
@@ -30,9 +30,9 @@ constexpr std::array kLoudnessFields{LoudnessField{"bext.loudnessValue", &Loudne
                                      LoudnessField{"bext.maxTruePeakLevel", &Loudness::maxTruePeak, 0, "dBTP"},
                                      LoudnessField{"bext.maxMomentaryLoudness", &Loudness::maxMomentary, 0.4, "LUFS"},
                                      LoudnessField{"bext.maxShortTermLoudness", &Loudness::maxShortTerm, 3, "LUFS"}};
-constexpr double kMostStored = 99.99; // of either sign
+constexpr double kMostStored = 99.99; // positive or negative
 
-/// Of a file that was cut the rest may still be had.
+/// A file that was cut must not be measured, since the rest may still arrive.
 void requireWhole(const std::string& path)
 {
     CAudioFileIO file;
@@ -93,7 +93,7 @@ MetaStep digestStep(const Bytes& digest)
     return metaStep("md5", hexText(digest), false);
 }
 
-/// Of the bytes of the samples, which may be none.
+/// The digest of the sample bytes, of which there may be none.
 Bytes digestOf(const std::string& path, bool quiet)
 {
     CAudioFileIO file;
@@ -104,7 +104,7 @@ Bytes digestOf(const std::string& path, bool quiet)
     Progress progress("reading", info.dataSize, quiet, path);
     if (info.dataSize > 0)
         requireOK(DigestAudio(file, info, digests, [&] {
-            progress.advance(1 << 20); // it asks ahead of each MiB
+            progress.advance(1 << 20); // called before each MiB
             return true;
         }));
     return digest.finish();
@@ -116,7 +116,7 @@ void requireNotTyped(const MeasuredFields& wanted, const std::vector<MetaStep>& 
 {
     for (const MetaStep& step : steps) {
         if (step.name.parts.front().number() != 0U)
-            continue; // of a second "bext"
+            continue; // a second "bext"
         const std::string name = step.name.pattern(false);
         if (wanted.loudness && std::ranges::find(kLoudnessFields, name, &LoudnessField::name) != kLoudnessFields.end())
             throw UsageError(name + " is what --loudness measures");

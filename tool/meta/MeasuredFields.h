@@ -1,21 +1,21 @@
-// Fields of WAVE files that are measured of the sound rather than typed.
+// Fields of WAVE files that are measured from the sound instead of typed.
 #pragma once
 
 #include "tool/meta/MetaFileEdit.h"
 
-/// Which of them are asked for.
+/// The fields that were requested.
 struct MeasuredFields {
-    bool loudness = false; // the five of "bext" version 2 (EBU Tech 3285), by EBU R 128
+    bool loudness = false; // five fields of "bext" version 2 (EBU Tech 3285), by EBU R 128
 
     bool md5 = false; // the digest in "MD5 "
 
     bool any() const { return loudness || md5; }
 };
 
-/// Throws UsageError where a step sets one that is measured, or a version of "bext" that has no loudness.
+/// Throws UsageError if a step sets a measured field, or a version of "bext" without loudness.
 void requireNotTyped(const MeasuredFields& wanted, const std::vector<MetaStep>& steps);
 
-/// As planMetadata, of `steps` and of those that set what is measured of the sound: what has no number to "not set".
-/// The other steps are tried first, since measuring takes its time.
+/// As planMetadata, with additional steps for the measured fields; a value that cannot be measured becomes "not set".
+/// The other steps are tried first, because measuring takes time.
 MetaPlan planMeasured(const std::string& path, std::vector<MetaStep> steps, const MeasuredFields& wanted,
                       bool isLenient, bool quiet);

@@ -36,7 +36,7 @@ MetaName parsedName(const std::string& text)
     return metaNameFromText(text).value_or(MetaName());
 }
 
-/// Texts of "strg" by the ids of markers are the markers' names.
+/// Texts of "strg" with ids of markers are the markers' names.
 void eraseNamesOfMarkers(std::vector<MetaCell>& cells, const std::vector<MetaField>& fields)
 {
     std::set<std::string> markers, names;
@@ -49,7 +49,7 @@ void eraseNamesOfMarkers(std::vector<MetaCell>& cells, const std::vector<MetaFie
     std::erase_if(cells, [&](const MetaCell& cell) { return names.contains(cell.name.text); });
 }
 
-/// Where the rules of a name stand among all.
+/// Position of the name's rules among all rules.
 std::ptrdiff_t ruleOrder(const MetaName& name)
 {
     for (const FourCC container : {fourCC("RIFF"), fourCC("FORM"), fourCC("caff")})
@@ -65,7 +65,7 @@ std::ptrdiff_t ruleOrder(const MetaName& name)
     return std::numeric_limits<std::ptrdiff_t>::max();
 }
 
-bool isOpen(const MetaName& name) // any name may follow
+bool isOpen(const MetaName& name) // accepts any name
 {
     return name.group() == "info" || name.group() == "ixml";
 }
@@ -75,7 +75,7 @@ std::size_t numberOf(const MetaName::Part& part)
     return part.index.empty() ? 0 : part.number().value_or(std::numeric_limits<std::size_t>::max() - 1) + 1;
 }
 
-/// What decides on the place of a column, first things first.
+/// Sort key of a column, most significant part first.
 struct ColumnKey {
     std::ptrdiff_t group;
     std::size_t place, item; // by their indices
@@ -86,11 +86,11 @@ struct ColumnKey {
 
 ColumnKey keyOf(const MetaName& name)
 {
-    // Comments follow the markers that they speak of.
+    // Comments follow the markers to which they refer.
     constexpr std::array<std::string_view, 14> groups{"bext", "info", "NAME", "AUTH", "(c)",  "ANNO", "cart",
                                                       "acid", "smpl", "cue",  "mark", "comt", "strg", "ixml"};
     const std::size_t item = isOpen(name) || name.parts.size() < 2 ? 0 : numberOf(name.parts[1]);
-    // A marker's id says which text is its name.
+    // A marker's id determines which text is its name.
     const bool isId = !isOpen(name) && name.parts.back().name == "id";
     ColumnKey key{std::ranges::find(groups, name.group()) - groups.begin(),
                   numberOf(name.parts[0]),
@@ -113,7 +113,7 @@ std::string withoutReturns(std::string_view text)
     return lines;
 }
 
-/// As the text that it replaces ends its lines.
+/// Uses the line ends of the text that is replaced.
 std::string withLineEndsOf(const std::string& before, const std::string& text)
 {
     if (before.find("\r\n") == std::string::npos || text.find('\r') != std::string::npos)
@@ -172,7 +172,7 @@ private:
         return found != there_.end() ? &found->second.text : nullptr;
     }
 
-    /// What needs a newer "bext" than is asked for beside it gets one.
+    /// Raises the version of "bext" if another cell requires it.
     std::string textFor(const MetaCell& cell) const
     {
         if (cell.name.group() != "bext" || cell.name.rest != "version" || cell.text.size() != 1)
@@ -206,7 +206,7 @@ private:
         }
     }
 
-    /// Line by line, so that those that stay keep their ends.
+    /// Goes line by line, so that unchanged lines keep their ends.
     void addHistory(const MetaCell& cell)
     {
         if (cell.text.empty())
@@ -221,7 +221,7 @@ private:
             addStep(name(i), std::nullopt);
     }
 
-    /// Chunks and items of which every field is an empty cell.
+    /// Removes chunks and items whose fields are all empty cells.
     void removeItems()
     {
         std::set<std::string, std::less<>> empty, items;
@@ -230,7 +230,7 @@ private:
                 empty.insert(cell.name.text);
         for (const auto& [name, cell] : there_)
             for (std::size_t part = 0; part + 1 < cell.name.parts.size(); ++part)
-                items.insert(cell.name.upTo(part)); // a chunk ahead of its items
+                items.insert(cell.name.upTo(part)); // a chunk before its items
         const std::vector<MetaField> fields = MetadataFieldsOf(held_);
         for (const std::string& item : items) {
             const MetaRule* const rule = ruleFor(parsedName(item), held_.container);

@@ -1,4 +1,4 @@
-// The fields of a file as cells of a table: those that can be set, each by the text that sets it.
+// The fields of a file that can be set, as cells of a table with the texts that set them.
 #pragma once
 
 #include "tool/meta/MetaFileEdit.h"
@@ -8,27 +8,26 @@ struct MetaCell {
     std::string text;
 };
 
-/// All fields that can be set, in the order of the file. The lines of a coding history are one cell, "codingHistory",
-/// and a text of "strg" that a marker shows stands with the marker only.
+/// All fields that can be set, in file order. The lines of a coding history are one cell, "codingHistory", and a text
+/// of "strg" that a marker shows appears only as the marker's.
 std::vector<MetaCell> cellsOf(const HeldMetadata& held, const MetaGroups& groups = {});
 
-/// The indices of the names in the order of columns: by groups, within these by item and by field. It is an order in
-/// which they can be set.
+/// The indices of the names in the order of columns: by group, then by item and field. Fields can be set in that order.
 std::vector<std::size_t> inOrder(const std::vector<MetaName>& names);
 
-/// As written to a table: in $'…' what holds control characters beside tabs and line ends, and what begins so.
+/// The text in a table: as $'…' if it contains control characters other than tabs and line ends, or begins like that.
 std::string writtenCell(std::string_view text);
-/// What is meant by what stands in a table. Throws UsageError.
+/// The meaning of a table's text. Throws UsageError.
 std::string meantCell(std::string_view cell);
 
-/// The steps that make a file's fields say what the cells do, which are in order; none for those that do already,
-/// whatever its line ends. An empty cell leaves its field alone; with `emptyRemoves` it removes it, and the item or the
-/// chunk of which every field goes. Throws Failure.
+/// The steps that give a file's fields the cells' values, in the cells' order; none for values that differ at most in
+/// line ends. An empty cell is ignored, or with `emptyRemoves` removes its field, and the item or chunk whose fields
+/// are all removed. Throws Failure.
 std::vector<MetaStep> stepsTo(const std::vector<MetaCell>& cells, const HeldMetadata& held, bool emptyRemoves,
                               bool isLenient);
 
-/// Why no file has this value; empty when one might. Dates must be those of the standard, since spreadsheets write
-/// them in other ways.
+/// Why the value is invalid for every file; empty if it may be valid. Dates must be the standard's, because
+/// spreadsheets write others.
 std::string problemOf(const MetaCell& cell, bool isLenient);
-/// Whether the file has it.
+/// Whether the file has the value.
 bool stands(const MetaCell& cell, const HeldMetadata& held);

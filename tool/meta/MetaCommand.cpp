@@ -21,7 +21,7 @@ struct MetaOptions {
 
 constexpr std::size_t kIdLength = 4;
 
-// Writes what is known of one file after the other.
+// Writes the metadata of one file after another.
 class MetaWriter : DataRecords {
 public:
     explicit MetaWriter(const OutputOptions& options) : DataRecords(options, metaColumns()), form_(outputForm(options))

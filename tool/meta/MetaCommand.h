@@ -1,4 +1,4 @@
-// What the verbs below `ktfiles meta` share.
+// Shared by the objects of `ktfiles meta`.
 #pragma once
 
 #include "audiofile/fields/FileMetadata.h"
@@ -6,11 +6,11 @@
 class CommandLine;
 class Verb;
 
-/// `meta set` and `meta remove`.
+/// Declares `meta set` and `meta remove`.
 void declareMetaEdits(CommandLine& commandLine, Verb& meta);
 void declareMetaCopy(CommandLine& commandLine, Verb& meta);
 void declareMetaExport(CommandLine& commandLine, Verb& meta);
 void declareMetaImport(CommandLine& commandLine, Verb& meta);
 
-/// "bext,ixml" as groups; what is no group may be the id of a chunk. Throws UsageError.
+/// Parses groups such as "bext,ixml"; an unknown group may be the id of a chunk. Throws UsageError.
 MetaGroups metaGroupsFromText(const std::string& text);

@@ -15,7 +15,7 @@
 
 namespace {
 
-/// What is replaced as a whole: "cue", "smpl.loop"; empty for other fields.
+/// The list that is replaced as a whole: "cue", "smpl.loop"; empty for other fields.
 std::string listOf(const MetaName& name)
 {
     const std::string& group = name.group();
@@ -24,13 +24,13 @@ std::string listOf(const MetaName& name)
     return group == "smpl" && name.parts.size() > 1 && name.parts[1].name == "loop" ? "smpl.loop" : "";
 }
 
-/// The item of a list that a field is of.
+/// The list item to which a field belongs.
 std::string itemOf(const MetaName& name)
 {
     return name.upTo(name.group() == "smpl" ? 1 : 0);
 }
 
-/// Ids of CAF's markers are those of texts, which are others in every file.
+/// Ids of CAF's markers refer to texts, which differ in every file.
 bool isOwnId(const MetaName& name, FourCC container)
 {
     return container == kCaff && (name.group() == "strg" || (name.group() == "mark" && name.rest == "id"));
@@ -46,13 +46,13 @@ void sortCells(std::vector<MetaCell>& cells)
     cells = std::move(sorted);
 }
 
-/// A number of frames at another rate; as it is where it is none.
+/// A number of frames at another rate; unchanged if it is not a number.
 std::string scaled(const std::string& text, const SoundChange& change)
 {
     std::uint64_t frames = 0;
     const char* const end = text.data() + text.size();
     if (std::from_chars(text.data(), end, frames).ptr != end) {
-        double exact = 0; // CAF has places between frames
+        double exact = 0; // CAF has positions between frames
         if (std::from_chars(text.data(), end, exact).ptr != end || !(exact >= 0 && exact < 1e15))
             return text;
         const double ratio = change.keepsRate() ? 1 : change.rate / change.sourceRate;
@@ -98,7 +98,7 @@ bool MetaCopySource::wants(std::string_view group) const
     return groups_.empty() || std::ranges::find(groups_, group) != groups_.end();
 }
 
-/// By chunks of the target's kind, whose fields are then those to copy.
+/// Translates through chunks of the target's kind, whose fields are then copied.
 MetaCopySource::Content MetaCopySource::translated(Family target, bool isLinearPCM) const
 {
     const Family family = familyOf(held_.container);
@@ -166,7 +166,7 @@ const MetaCopySource::Content& MetaCopySource::contentFor(FourCC container) cons
     return found != others_.end() ? found->second : own_;
 }
 
-/// With their places at the rate of the target, and without what is of the source's sound only.
+/// With positions at the target's rate, without what describes only the source's sound.
 std::vector<MetaCell> MetaCopySource::cellsFor(const HeldMetadata& held) const
 {
     const SoundChange change{.sourceRate = held_.sampleRate, .rate = held.sampleRate};
@@ -189,7 +189,7 @@ std::vector<std::vector<MetaStep>> MetaCopySource::stagesFor(const HeldMetadata&
 {
     using Texts = std::map<std::string, std::string>;
     std::vector<MetaCell> cells = cellsFor(held);
-    std::map<std::string, Texts> here, there; // the fields of each list
+    std::map<std::string, Texts> here, there; // fields of each list
     std::map<std::string, std::vector<std::string>> items;
     for (const MetaCell& cell : cells)
         if (const std::string list = listOf(cell.name); !list.empty())

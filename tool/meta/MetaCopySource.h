@@ -1,17 +1,17 @@
-// What one file has for others: the fields that can be set, in the words of each kind of container.
+// The fields of one file that can be set in others, in the terms of each kind of container.
 #pragma once
 
 #include "tool/meta/MetaCells.h"
 
 class MetaCopySource {
 public:
-    /// Reads the groups that are wanted; empty: all. Throws Failure.
+    /// Reads the requested groups; all if empty. Throws Failure.
     MetaCopySource(const std::string& path, MetaGroups groups);
 
-    /// The stages that give a file what the source has: lists of points, markers, comments and loops are replaced,
-    /// other fields that the source does not have stay. Places in the sound go to the rate of the file.
+    /// The stages that give a file the source's metadata: lists of points, markers, comments and loops are replaced;
+    /// other fields missing in the source stay. Positions are converted to the file's rate.
     std::vector<std::vector<MetaStep>> stagesFor(const HeldMetadata& held, bool isLenient) const;
-    /// What files of the container have no place for, by fields or groups, in words.
+    /// Fields or groups for which files of the container have no place, in words.
     const std::vector<std::string>& leftFrom(FourCC container) const { return contentFor(container).left; }
     bool isEmpty() const { return own_.cells.empty(); }
 

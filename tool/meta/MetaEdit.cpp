@@ -16,14 +16,14 @@
 
 namespace {
 
-/// Removals go from the last item to the first, so that the indices ahead stay true; what an item has goes before it.
+/// Items are removed from last to first, so that earlier indices stay valid; an item's fields are removed before it.
 bool goesBefore(const MetaStep& a, const MetaStep& b)
 {
     const auto isVersion = [](const MetaStep& step) { return step.name.rest == "version"; };
     if (a.isRemoval() != b.isRemoval())
         return b.isRemoval();
     if (!a.isRemoval())
-        return isVersion(a) && !isVersion(b); // other fields depend on it
+        return isVersion(a) && !isVersion(b); // other fields depend on the version
     const std::size_t shared = std::min(a.name.parts.size(), b.name.parts.size());
     for (std::size_t i = 0; i < shared; ++i)
         if (const auto left = a.name.parts[i].number(), right = b.name.parts[i].number(); left != right)
@@ -31,7 +31,7 @@ bool goesBefore(const MetaStep& a, const MetaStep& b)
     return a.name.parts.size() > b.name.parts.size();
 }
 
-/// As it was typed; a long text is told by its beginning.
+/// As typed; a long text is shortened.
 std::string inWords(const std::string& name, const std::optional<std::string>& text)
 {
     constexpr std::size_t most = 60;
@@ -39,7 +39,7 @@ std::string inWords(const std::string& name, const std::optional<std::string>& t
         return printable(name);
     std::size_t end = std::min(text->size(), most);
     while (end < text->size() && (static_cast<unsigned char>((*text)[end]) & 0xC0) == 0x80)
-        ++end; // not within a character
+        ++end; // do not cut a character
     return fmt::format("{}={}{}", printable(name), printable(text->substr(0, end)), end < text->size() ? "…" : "");
 }
 
@@ -57,17 +57,17 @@ RuleLists rulesOf(FourCC container)
     }
 }
 
-/// Of these the brackets name an item, of others one of several chunks.
+/// In these groups brackets name an item, in others one of several chunks.
 bool isList(std::string_view group)
 {
     constexpr std::array<std::string_view, 4> lists{"cue", "comt", "mark", "strg"};
     return std::ranges::find(lists, group) != lists.end();
 }
 
-/// Throws UsageError for what can stand in no brackets, whatever the file. Keys of CAF may have any.
+/// Throws UsageError for brackets that are invalid in every file. Keys of CAF may contain any.
 void requireIndices(const MetaName& name, bool isRemoval)
 {
-    constexpr std::array<std::string_view, 4> texts{"NAME", "AUTH", "(c)", "ANNO"}; // chunks, of which there are more
+    constexpr std::array<std::string_view, 4> texts{"NAME", "AUTH", "(c)", "ANNO"}; // several chunks are possible
     const std::string& group = name.group();
     for (const MetaName::Part& part : name.parts) {
         const bool isFirst = &part == &name.parts.front();
@@ -142,7 +142,7 @@ void MetaEdit::apply()
         try {
             if (step.text && !step.text->empty())
                 step.value = metaValueFromText(rule->kind, rule->range, *step.text, isLenient_);
-        } catch (const UsageError& error) { // which another container may take
+        } catch (const UsageError& error) { // another container may accept it
             refuse(step, error.what());
         }
     }

@@ -19,7 +19,7 @@ std::string inWords(const MetaChange& change)
            (change.from ? " (was " + inWords(*change.from) + ")" : "");
 }
 
-/// An empty element, say, goes without a field of it.
+/// Some removals change no field, for example of an empty element.
 std::string inWords(const MetaPlan& plan)
 {
     std::string text;
@@ -31,7 +31,7 @@ std::string inWords(const MetaPlan& plan)
     return text;
 }
 
-/// Why first, with the fields of which that is so.
+/// The reason, followed by the fields that it concerns.
 std::string inWords(const std::vector<UnmeasuredField>& unmeasured)
 {
     std::map<std::string, std::string> fields;
@@ -82,7 +82,7 @@ void MetaEdits::fail(const std::string& path, const std::string& text)
 {
     ++failed_;
     json_.addFailure(path, text);
-    Output::standard().flush(); // what was told so far comes first
+    Output::standard().flush(); // earlier output comes first
     reportFailure(path, text);
 }
 
@@ -126,7 +126,7 @@ void MetaEdits::tell(const std::string& path, const MetaPlan& plan, const std::s
         const auto columns = columnsOfOutput();
         if (!columns || plan.changes.empty() || displayWidth(all) <= *columns)
             return Output::standard().print("{}\n", all);
-        // On a terminal a line for each field where one does not hold them all.
+        // On a terminal, one line per field if they do not fit in one.
         const std::size_t count = plan.changes.size();
         Output::standard().print("{}\n", line(fmt::format("{} {} {}", done, count, count == 1 ? "field" : "fields")));
         for (const MetaChange& change : plan.changes)

@@ -1,4 +1,4 @@
-// Edits of the metadata of several files, one by one, each told when it is done.
+// Edits the metadata of several files one by one and reports each.
 #pragma once
 
 #include "tool/meta/MetaFileEdit.h"
@@ -11,16 +11,16 @@ struct MetaEditWords {
 
 class MetaEdits {
 public:
-    /// Throws Failure; is called with the file while nobody else changes it.
+    /// Throws Failure; called with the file while nobody else changes it.
     using Plan = std::function<MetaPlan(const std::string& target)>;
 
     MetaEdits(const MetaEditWords& words, EditOptions options, const OutputOptions& output);
 
-    /// Nothing is written where the plan changes nothing. A Failure is told, with `place` ahead of it.
+    /// Writes nothing if the plan changes nothing. Reports a Failure, preceded by `place`.
     void edit(const std::string& path, const Plan& plan, const std::string& place = {});
-    /// Of a file that is not come to.
+    /// Reports a file that is not processed.
     void fail(const std::string& path, const std::string& text);
-    /// Behind the last; false when one failed.
+    /// Call after the last file; false if one failed.
     bool finish();
 
     std::size_t changed() const { return changed_; }

@@ -1,4 +1,4 @@
-// ktfiles meta export: the fields of many files as one table.
+// ktfiles meta export: writes the fields of many files as one table.
 #include "tool/meta/MetaCommand.h"
 #include "tool/meta/MetaTableWriter.h"
 #include "tool/shared/access/FileAccess.h"
@@ -20,7 +20,7 @@ struct ExportArguments {
     unsigned threads = 0;
 };
 
-/// The table takes its name when it is whole.
+/// The table gets its name when it is complete.
 class TableOutput {
 public:
     explicit TableOutput(const ExportArguments& arguments)
@@ -39,7 +39,7 @@ public:
         if ((kept_ += text).size() >= kPiece)
             flush();
     }
-    /// That no file is replaced by the table that tells of it.
+    /// No listed file may be replaced by the table.
     void requireOther(const std::string& path)
     {
         struct stat status = {};

@@ -18,7 +18,7 @@ FileMetadata readMetadata(const std::string& path, const MetaGroups& groups)
     if (auto metadata = ReadMetadataFields(referenceTo(path), groups, &error))
         return std::move(*metadata);
     if (CAudioFileIO audio; is(error, MetadataError::noAudio))
-        openAudio(audio, path); // says best what is wrong with it
+        openAudio(audio, path); // knows best what is wrong with it
     throw Failure(error.description);
 }
 

@@ -31,7 +31,7 @@ std::vector<const MetaChunk*> chunksOf(const HeldMetadata& held, FourCC id)
     return chunks;
 }
 
-/// Chunks keep their offset in the plan, by which the same one is known before and after.
+/// Chunks keep their offset in the plan, which identifies them before and after.
 void addItems(MetaPlan& plan, FourCC id)
 {
     const auto before = chunksOf(plan.before, id), after = chunksOf(plan.after, id);
@@ -55,7 +55,7 @@ bool isBelow(std::string_view field, std::string_view item)
     return field.starts_with(item) && (field.size() == item.size() || field[item.size()] == '.');
 }
 
-/// As numbers are shown: what is none is as any other that is none.
+/// Compares numbers as they are shown; all NaNs are equal.
 bool isSame(const MetaField::Value& a, const MetaField::Value& b)
 {
     const auto isNone = [](const MetaField::Value& value) {
@@ -65,8 +65,8 @@ bool isSame(const MetaField::Value& a, const MetaField::Value& b)
     return a == b || (isNone(a) && isNone(b));
 }
 
-/// What fields say that were there, are there, or both. Where an item went by its index, the names of what follows say
-/// something else now, which is no change: of its group the item's own fields count, and those that were set.
+/// Fields that existed, exist now, or both. After removing an item by index, later items have other names, which is not
+/// a change: in that group only the item's own fields and those that were set count.
 std::vector<MetaChange> changesOf(const MetaPlan& plan, const std::vector<std::string>& removedItems,
                                   const std::vector<MetaStep>& steps)
 {
@@ -102,7 +102,7 @@ std::vector<MetaChange> changesOf(const MetaPlan& plan, const std::vector<std::s
     return changes;
 }
 
-/// An unfinished recording behind the chunks, say. What keeps its size is written where it stands.
+/// Refuses for example an unfinished recording after the chunks. A chunk that keeps its size is written in place.
 void requireRoom(const std::string& path, const MetaPlan& plan)
 {
     const bool staysInPlace = std::ranges::all_of(plan.items, [&](const MetaItemEdit& item) {
@@ -111,7 +111,7 @@ void requireRoom(const std::string& path, const MetaPlan& plan)
     });
     if (staysInPlace)
         return;
-    constexpr FourCC some = fourCC("bext"); // of which there may be several
+    constexpr FourCC some = fourCC("bext"); // a kind of chunk of which there may be several
     CAudioFileIO file;
     openContainer(file, path, 0);
     if (const auto objection = objectionToAdding(file, surveyChunks(file, some), some))
@@ -138,7 +138,7 @@ HeldMetadata holdEdited(const std::string& path, const MetaGroups& groups)
     CAudioFileIO file;
     const ContainerProblem problem = OpenContainer(file, referenceTo(path), 0);
     if (problem.kind == ContainerProblem::Kind::noContainer)
-        requireKnown(path); // says best what is wrong with what is no audio
+        requireKnown(path); // knows best what is wrong with a file that is no audio
     HeldMetadata held;
     if (!problem)
         held = holdMetadata(path, groups);

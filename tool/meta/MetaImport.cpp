@@ -1,4 +1,4 @@
-// ktfiles meta import: the fields of many files from one table.
+// ktfiles meta import: sets the fields of many files from one table.
 #include "tool/meta/MetaCommand.h"
 #include "tool/meta/MetaEdits.h"
 #include "tool/meta/MetaFile.h"
@@ -23,7 +23,7 @@ struct ImportArguments {
     EditOptions options;
 };
 
-/// What the file has already is no problem of the table.
+/// A value that the file has already is no problem of the table.
 bool stands(const MetaCell& cell, const std::string& path, const ImportArguments& arguments)
 {
     try {
@@ -92,7 +92,7 @@ bool importRows(const MetaTable& table, const ImportArguments& arguments, const 
                         arguments.isLenient);
                 },
                 fmt::format("line {}: ", row.line));
-            Output::standard().flush(); // whatever comes, what is done is told
+            Output::standard().flush(); // finished work is reported, whatever follows
             progress.advance(1, FilesProgress::takeParts());
             if (Output::standard().failed())
                 break;

@@ -1,4 +1,4 @@
-// ktfiles meta set, and remove.
+// ktfiles meta set and remove.
 #include "tool/meta/MeasuredFields.h"
 #include "tool/meta/MetaCommand.h"
 #include "tool/meta/MetaEdits.h"
@@ -15,7 +15,7 @@ namespace {
 
 struct EditArguments {
     std::vector<std::string> words;
-    FileArguments files; // those of the list; the others are among the words
+    FileArguments files; // files of the list; the others are among the words
     bool isLenient = false;
     MeasuredFields measured;
     EditOptions options;
@@ -40,7 +40,7 @@ void addStep(std::vector<MetaStep>& steps, MetaStep step)
         steps.push_back(std::move(step));
 }
 
-/// A word with "=" and no "/" ahead of it is a field with its value; the others are files.
+/// A word with "=" and no "/" before it is a field with its value; other words are files.
 std::vector<MetaStep> takeAssignments(EditArguments& arguments)
 {
     std::vector<MetaStep> steps;
@@ -57,7 +57,7 @@ std::vector<MetaStep> takeAssignments(EditArguments& arguments)
     return steps;
 }
 
-/// Under "info" and "ixml" any name may stand: a file of that name is meant first.
+/// Any name is possible under "info" and "ixml", so an existing file of that name takes precedence.
 bool isOpenName(const std::string& word)
 {
     return word.starts_with("info.") || word.starts_with("ixml.");

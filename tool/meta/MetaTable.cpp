@@ -20,9 +20,9 @@
 
 namespace {
 
-constexpr std::size_t kMostOfTable = 512 << 20; // of a table, which is held
+constexpr std::size_t kMostOfTable = 512 << 20; // per table, which is held in memory
 
-// What bwfmetaedit calls the fields of its core document, beside the ids of INFO.
+// bwfmetaedit's names for the fields of its core document, other than INFO ids.
 constexpr std::pair<std::string_view, std::string_view> kCoreNames[] = {
     {"Description", "bext.description"},
     {"Originator", "bext.originator"},
@@ -72,7 +72,7 @@ std::string contentOf(const std::string& file)
     }
 }
 
-/// Spreadsheets write other encodings unless they are told not to.
+/// Spreadsheets write other encodings unless told otherwise.
 void requireUTF8(std::string_view text)
 {
     std::size_t line = 1;
@@ -86,7 +86,7 @@ void requireUTF8(std::string_view text)
             continue;
         }
         const std::size_t before = text.size();
-        constexpr char32_t replacement = 0xFFFD; // which may be there itself, in three bytes
+        constexpr char32_t replacement = 0xFFFD; // the text may contain it legitimately, in three bytes
         if (takeCharacter(text) == replacement && before - text.size() < 3)
             throw Failure(fmt::format("line {}: is not UTF-8; save the table as CSV in UTF-8", line));
     }
@@ -172,7 +172,7 @@ MetaTable MetaTableMaker::finish()
     }
     table_.columns = std::move(columns);
     std::map<std::string, std::size_t, std::less<>> paths;
-    std::map<std::pair<std::uint64_t, std::uint64_t>, std::size_t> files; // which may be named in two ways
+    std::map<std::pair<std::uint64_t, std::uint64_t>, std::size_t> files; // a file may be named in two ways
     for (MetaRow& row : table_.rows) {
         for (MetaRow::Cell& cell : row.cells)
             cell.column = places[cell.column];

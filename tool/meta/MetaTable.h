@@ -1,24 +1,24 @@
-// A table of metadata: files by rows, fields by columns, read from CSV or from the XML that `meta export` writes.
+// A table of metadata with files as rows and fields as columns, read from CSV or from the XML of `meta export`.
 #pragma once
 
 #include "tool/meta/MetaCells.h"
 
 struct MetaColumn {
-    std::string heading; // as it stands there
+    std::string heading; // as it stands in the table
     MetaName field;
 };
 
 struct MetaRow {
     struct Cell {
         std::size_t column = 0;
-        std::string text; // as meant
+        std::string text; // its meaning
     };
-    std::size_t line = 0; // on which it begins, counted from 1
+    std::size_t line = 0; // where it begins, counted from 1
     std::string path;
-    std::vector<Cell> cells; // in the order of columns
+    std::vector<Cell> cells; // in column order
 };
 
-/// What is wrong with a table.
+/// A problem in a table.
 struct TableProblem {
     std::size_t line = 0;
     std::string text;
@@ -27,36 +27,35 @@ struct TableProblem {
 struct MetaTable {
     std::vector<MetaColumn> columns; // in the order in which fields are set
     std::vector<MetaRow> rows;
-    std::vector<TableProblem> problems; // while there are any, rows may be missing
+    std::vector<TableProblem> problems; // if there are any, rows may be missing
 
     std::vector<MetaCell> cellsOf(const MetaRow& row) const;
 };
 
-/// Which is it, is seen from the first character. Headings are names of fields, or those that the core export of
-/// bwfmetaedit has; one of them is "path" or "FileName". Throws Failure for what cannot be read, and for what is no
-/// table.
+/// The first character tells the format. Headings are names of fields, or those of bwfmetaedit's core export; one of
+/// them is "path" or "FileName". Throws Failure if the file cannot be read or is no table.
 MetaTable readMetaTable(const std::string& file);
-/// The same of a text that begins as XML does, or not.
+/// As above for a text in XML.
 MetaTable metaTableFromXML(std::string_view text);
 MetaTable metaTableFromCSV(std::string_view text);
 
-/// Columns and rows as they come, made a table in the end.
+/// Collects columns and rows, and makes a table of them in the end.
 class MetaTableMaker {
 public:
-    /// The index of a column; of one that is there already its own.
+    /// The index of a column; adds the column if it is new.
     std::size_t column(const std::string& heading);
-    /// The problem of a heading; empty when it names a field, or a file, or is passed over.
+    /// What is wrong with a heading; empty if it names a field or a file, or is ignored.
     static std::string problemOf(const std::string& heading);
     static bool isPath(const std::string& heading);
 
     void add(MetaRow row) { table_.rows.push_back(std::move(row)); }
     void addProblem(std::size_t line, std::string text) { table_.problems.push_back({line, std::move(text)}); }
-    /// The text of a cell as it is meant; empty, with a problem, where it is none.
+    /// The meaning of a cell's text; empty, with a problem, if it has none.
     std::string meant(std::size_t line, const std::string& heading, std::string_view cell);
 
     MetaTable finish();
 
 private:
     MetaTable table_;
-    std::map<std::string, std::size_t, std::less<>> columns_; // by their fields
+    std::map<std::string, std::size_t, std::less<>> columns_; // by field
 };

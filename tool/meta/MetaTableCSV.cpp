@@ -1,4 +1,4 @@
-// Tables of metadata as spreadsheets have them.
+// Tables of metadata in CSV, as spreadsheets write it.
 #include "tool/meta/MetaTable.h"
 #include "tool/shared/input/CsvReader.h"
 #include "tool/shared/output/Failure.h"
@@ -12,7 +12,7 @@
 
 namespace {
 
-constexpr std::string_view kTranslated = "TimeReference (translated)"; // a time, beside the frames
+constexpr std::string_view kTranslated = "TimeReference (translated)"; // a time, in addition to the frames
 
 std::string withoutBlanks(const std::string& text)
 {
@@ -20,19 +20,19 @@ std::string withoutBlanks(const std::string& text)
     return begin == std::string::npos ? "" : text.substr(begin, text.find_last_not_of(' ') + 1 - begin);
 }
 
-/// How many columns the first line has with a separator; 0: none of them names files.
+/// The number of columns in the first line with that separator; 0 if none names files.
 std::size_t columnsWith(std::string_view text, char separator)
 {
     try {
         const auto row = CsvReader(text, separator).next();
         const auto isPath = [](const std::string& cell) { return MetaTableMaker::isPath(withoutBlanks(cell)); };
         return row && std::ranges::any_of(row->cells, isPath) ? row->cells.size() : 0;
-    } catch (const Failure&) { // quotation marks end elsewhere with another one
+    } catch (const Failure&) { // with another separator, quotation marks end elsewhere
         return 0;
     }
 }
 
-/// That which makes the most of the first line.
+/// The separator that yields the most columns in the first line.
 char separatorOf(std::string_view text)
 {
     constexpr std::array separators{',', ';', '\t'};
@@ -62,7 +62,7 @@ private:
     void takeHeadings()
     {
         headings_ = *reader_.next();
-        std::map<std::size_t, std::size_t> first; // where each column of the table is named
+        std::map<std::size_t, std::size_t> first; // first occurrence of each table column
         for (std::size_t i = 0; i < headings_.cells.size(); ++i) {
             std::string& heading = headings_.cells[i];
             heading = withoutBlanks(heading);
@@ -111,7 +111,7 @@ private:
         maker_.add(std::move(row));
     }
 
-    /// Of two for one field the frames count, and the time where there are none.
+    /// If a field has both, frames take precedence over the time.
     static void addCell(MetaRow& row, MetaRow::Cell cell, bool isTranslated)
     {
         const auto other = std::ranges::find(row.cells, cell.column, &MetaRow::Cell::column);
@@ -124,7 +124,7 @@ private:
     CsvReader reader_;
     MetaTableMaker maker_;
     CsvRow headings_;
-    std::vector<std::size_t> columns_; // of the table, by those of the file
+    std::vector<std::size_t> columns_; // table columns by those of the file
     std::size_t path_ = kNone;
 };
 

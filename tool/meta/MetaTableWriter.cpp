@@ -28,13 +28,13 @@ std::string escapedXML(std::string_view text, InXML place)
         else if (c == '>')
             escaped += "&gt;";
         else if (c == '\r' || (place == InXML::attribute && (c == '"' || c == '\n' || c == '\t')))
-            escaped += fmt::format("&#{};", static_cast<int>(c)); // which parsers would change
+            escaped += fmt::format("&#{};", static_cast<int>(c)); // parsers would change the character
         else
             escaped += c;
     return escaped;
 }
 
-/// Names of files may hold what no XML document can: each such byte as `\xNN`, and every backslash so.
+/// File names may contain bytes that XML forbids: each becomes `\xNN`, and every backslash likewise.
 std::string pathInXML(const std::string& path)
 {
     std::string text;

@@ -1,4 +1,4 @@
-// Tables of metadata being written, a file after the other.
+// Writes tables of metadata file by file.
 #pragma once
 
 #include "tool/meta/MetaCells.h"
@@ -9,18 +9,18 @@
 class MetaTableWriter {
 public:
     virtual ~MetaTableWriter() = default;
-    /// `path` is as output shows it.
+    /// `path` is as in the output.
     virtual void add(const std::string& path, const std::vector<MetaCell>& cells) = 0;
     virtual void finish() = 0;
-    /// Files that failed are in no table.
+    /// Files that failed appear in no table.
     void addFailure(const std::string&, const std::string&) {}
 };
 
-/// A row for each file, a column for each field that any file has. The columns are known behind the last file: until
-/// then rows lie in a temporary file, so that memory is for the names of columns only.
+/// A row per file and a column per field of any file. The columns are known only after the last file, so rows are kept
+/// in a temporary file and only the names of columns in memory.
 class MetaCSVWriter : public MetaTableWriter {
 public:
-    /// With `marked` a byte order mark comes first, by which some spreadsheets know UTF-8.
+    /// `marked` adds a byte order mark, by which some spreadsheets recognize UTF-8.
     MetaCSVWriter(Sink sink, bool marked);
     void add(const std::string& path, const std::vector<MetaCell>& cells) override;
     void finish() override;
@@ -37,11 +37,11 @@ private:
     bool marked_;
     std::unique_ptr<std::FILE, Closing> rows_;
     std::size_t count_ = 0;
-    std::vector<MetaName> names_; // of the columns, as they came
+    std::vector<MetaName> names_; // of the columns, in order of appearance
     std::map<std::string, std::size_t, std::less<>> columns_;
 };
 
-/// An element for each file, and in it one for each field, in the order of the file.
+/// An element per file, with an element per field in file order.
 class MetaXMLWriter : public MetaTableWriter {
 public:
     explicit MetaXMLWriter(Sink sink);

@@ -1,4 +1,4 @@
-// Tables of metadata as `meta export --xml` writes them.
+// Tables of metadata in the XML of `meta export --xml`.
 #include "platform/XMLParser.h"
 #include "tool/meta/MetaTable.h"
 #include "tool/shared/output/Failure.h"

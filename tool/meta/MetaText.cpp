@@ -19,7 +19,7 @@ std::string timeText(double seconds)
     return clockText(seconds, 3, ShowHours::always);
 }
 
-/// A value as people read it: "480000 (0:00:10.000)", "-23 LUFS", "12 bytes: 0a00 |..|".
+/// A value for people: "480000 (0:00:10.000)", "-23 LUFS", "12 bytes: 0a00 |..|".
 std::string readable(const MetaField& field)
 {
     const std::string value = printable(valueText(field));
@@ -37,13 +37,13 @@ void tellValue(const MetaField& field, JsonWriter& json)
     std::visit([&](const auto& value) { json.member("value", value); }, field.value);
 }
 
-/// As text, since a record's numbers have a sign.
+/// As text, because numbers in a record are signed.
 void tellValue(const MetaField& field, Record& record)
 {
     record.member("value", valueText(field));
 }
 
-/// The keys of JSON and the columns of CSV; `sink` is either's record, `name` the field's.
+/// Keys in JSON and columns in CSV; `sink` is the record of either, `name` the field's.
 template <class Sink>
 void tell(const MetaField& field, const std::string& name, Sink& sink)
 {
@@ -55,7 +55,7 @@ void tell(const MetaField& field, const std::string& name, Sink& sink)
         sink.member("encoding", field.encoding);
 }
 
-/// Where it stands.
+/// The field's place.
 template <class Sink>
 void tellOrigin(const MetaField& field, Sink& sink)
 {
@@ -63,7 +63,7 @@ void tellOrigin(const MetaField& field, Sink& sink)
         sink.member("chunk", fourCCText(field.chunk)).member("offset", field.offset);
 }
 
-/// What stands ahead of a value; of a text its id's meaning too.
+/// The label of a value; for a text it includes the meaning of its id.
 std::string label(const MetaField& field)
 {
     const bool isNamedText =
@@ -71,7 +71,7 @@ std::string label(const MetaField& field)
     return printable(field.name) + (isNamedText ? " " + printable(field.words) : "");
 }
 
-/// One row for each field; of a file that says nothing one that has the path alone.
+/// One row per field; a file without fields has a row with its path alone.
 std::string rows(const std::string& path, const FileMetadata& metadata)
 {
     const Record file = Record().member("path", path);
@@ -128,7 +128,7 @@ std::string MetaText::json(const std::string& path, const FileMetadata& metadata
     if (metadata.container != 0)
         json.member("container", fourCCText(metadata.container));
     json.key("fields").beginArray();
-    std::string name, origin; // the members that all fields of a chunk have
+    std::string name, origin; // members shared by all fields of a chunk
     const MetaField* above = nullptr;
     for (const MetaField& field : metadata.fields) {
         name.clear();
@@ -163,7 +163,7 @@ std::string MetaText::lines(const std::string& path, const FileMetadata& metadat
     return text;
 }
 
-/// A heading for each chunk, its fields below it, their values in one column.
+/// A heading per chunk, its fields below it with their values in one column.
 std::string MetaText::tree(const std::string& path, const FileMetadata& metadata) const
 {
     constexpr int widest = 40;

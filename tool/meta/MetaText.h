@@ -1,16 +1,16 @@
-// What is written of a file's metadata, in each form of output.
+// Formats a file's metadata for each form of output.
 #pragma once
 
 #include "audiofile/fields/FileMetadata.h"
 #include "tool/shared/output/CsvRecords.h"
 
-/// Of each file on its own, so that those who read the files make the texts too.
+/// Works on each file separately, so that the threads that read files also format them.
 class MetaText {
 public:
-    /// With `several` files each line says which.
+    /// With `several` files each line names its file.
     MetaText(const OutputOptions& options, bool several);
 
-    /// The tree, the lines, the object of JSON or the rows of CSV; empty where nothing is to be written.
+    /// The tree, the lines, the JSON object or the CSV rows; empty if nothing is written.
     std::string of(const std::string& path, const FileMetadata& metadata) const;
 
 private:
@@ -24,5 +24,5 @@ private:
     bool several_;
 };
 
-/// Of CSV, in the order of the keys of JSON.
+/// CSV columns in the order of the JSON keys.
 CsvColumns metaColumns();

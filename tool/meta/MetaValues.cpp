@@ -26,8 +26,8 @@ namespace {
 
 struct PictureRate {
     std::string_view text;
-    std::int64_t perSecond;              // as a time code counts them
-    std::int64_t numerator, denominator; // of the seconds that a picture takes
+    std::int64_t perSecond;              // as a time code counts
+    std::int64_t numerator, denominator; // length of a picture in seconds
 };
 constexpr PictureRate kPictureRates[] = {
     {"24", 24, 1, 24},          {"25", 25, 1, 25},          {"30", 30, 1, 30},           {"48", 48, 1, 48},
@@ -45,7 +45,7 @@ std::optional<Number> numberFrom(std::string_view text)
     return error == std::errc() && end == text.data() + text.size() ? std::optional(number) : std::nullopt;
 }
 
-/// Numbers of so many `digits` each, one of `separators` between two.
+/// Takes numbers with the given `digits`, separated by one of `separators`.
 bool takeNumbers(std::string_view text, std::span<int> numbers, std::span<const int> digits,
                  std::string_view separators)
 {
@@ -73,7 +73,7 @@ std::int64_t picturesOf(const std::string& text, std::string_view code, const Pi
         refuse("a time code such as 01:00:00:00@25 expected");
     const bool dropsPictures = code[8] == ';';
     const std::int64_t minute = parts[0] * 60 + parts[1];
-    const std::int64_t dropped = rate.perSecond / 15; // of each minute, but for each tenth
+    const std::int64_t dropped = rate.perSecond / 15; // every minute except each tenth
     if (dropsPictures && (rate.numerator == 1 || rate.perSecond % 30 != 0))
         refuse(fmt::format("{}: only 29.97 and 59.94 pictures a second have drop-frame codes", text));
     if (dropsPictures && parts[1] % 10 != 0 && parts[2] == 0 && parts[3] < dropped)
@@ -144,7 +144,7 @@ Bytes hexValue(std::string_view text, const char* expected)
     return bytes;
 }
 
-/// A digest as it is written, RFC 1321.
+/// A digest as written in RFC 1321.
 MetaValue digestValue(std::string_view text)
 {
     constexpr std::size_t size = 16;
@@ -246,7 +246,7 @@ std::uint64_t MetaTime::at(double sampleRate) const
 {
     if (pictures < 0)
         return length.at(sampleRate);
-    // Whole numbers, so that an hour of 29.97 pictures a second is exact.
+    // Integers keep an hour at 29.97 pictures per second exact.
     const long double frames = static_cast<long double>(pictures) * static_cast<long double>(numerator) *
                                static_cast<long double>(sampleRate) / static_cast<long double>(denominator);
     return static_cast<std::uint64_t>(std::roundl(frames));

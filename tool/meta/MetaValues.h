@@ -1,4 +1,4 @@
-// Values of metadata fields, from what people type.
+// Parses values of metadata fields as people type them.
 #pragma once
 
 #include "platform/core/Bytes.h"
@@ -8,10 +8,10 @@
 #include <string>
 #include <variant>
 
-/// A place in the sound: frames, a time, or a time code with its frame rate.
+/// A position in the sound: frames, a time, or a time code with its frame rate.
 struct MetaTime {
     SoundLength length;
-    // Of a time code, in pictures of `numerator` / `denominator` seconds:
+    // For a time code, in pictures of `numerator` / `denominator` seconds.
     std::int64_t pictures = -1;
     std::int64_t numerator = 1, denominator = 1;
 
@@ -20,8 +20,8 @@ struct MetaTime {
     std::uint64_t at(double sampleRate) const;
 };
 
-/// "48000", "1.5s", "1:02:03.5", "01:00:00:00@25"; 24, 25, 30, 48, 50 and 60 pictures a second, 23.976, 29.97 and
-/// 59.94, of those with ";" ahead of the pictures as drop-frame code. Throws UsageError.
+/// "48000", "1.5s", "1:02:03.5", "01:00:00:00@25"; 24, 25, 30, 48, 50 and 60 pictures per second, 23.976, 29.97 and
+/// 59.94, the latter two with ";" before the pictures as drop-frame code. Throws UsageError.
 MetaTime metaTimeFromText(const std::string& text);
 
 enum class MetaKind {
@@ -47,9 +47,9 @@ struct MetaRange {
 };
 inline constexpr MetaRange kAnyLength{0, 1e9}, kUnsigned16{0, 65535}, kUnsigned32{0, 4294967295.0};
 
-/// Numbers stand for ids, types, offsets and moments, as chunks have them; nothing for a removal.
+/// Ids, types, offsets and moments are numbers as in chunks; nothing for a removal.
 using MetaValue = std::variant<std::monostate, std::string, std::int64_t, double, MetaTime, Bytes>;
 
-/// `isLenient` takes texts, dates and labels that the standards do not; never more bytes than there is room for. Throws
-/// UsageError; the caller adds which field it is about.
+/// `isLenient` accepts texts, dates and labels that the standards forbid, but never more bytes than fit. Throws
+/// UsageError; the caller adds the field's name.
 MetaValue metaValueFromText(MetaKind kind, MetaRange range, const std::string& text, bool isLenient);

@@ -1,4 +1,4 @@
-// How fields of "cart", "acid" and "smpl" are set.
+// Sets fields of "cart", "acid" and "smpl".
 #include "audiofile/metadata/AcidChunk.h"
 #include "audiofile/metadata/CartChunk.h"
 #include "audiofile/metadata/SamplerChunk.h"
@@ -14,7 +14,7 @@
 
 namespace {
 
-// What a file gets that has no such chunk yet.
+// The new chunk for a file without one.
 
 CartChunk freshOf(const MetaEdit&, const CartChunk*)
 {
@@ -26,7 +26,7 @@ CartChunk freshOf(const MetaEdit&, const CartChunk*)
 AcidChunk freshOf(const MetaEdit&, const AcidChunk*)
 {
     AcidChunk acid;
-    acid.unknown = 0x8000; // as others write it
+    acid.unknown = 0x8000; // as other programs write it
     return acid;
 }
 
@@ -68,7 +68,7 @@ constexpr auto setAcid = set<AcidChunk, member>;
 template <auto member>
 constexpr auto setSampler = set<SamplerChunk, member>;
 
-// "cart":
+// "cart".
 
 template <bool isUsage>
 void setTimer(MetaEdit& edit, const MetaStep& step)
@@ -98,9 +98,9 @@ void setTagText(MetaEdit& edit, const MetaStep& step)
     changeChunk<CartChunk>(edit, step, [&](CartChunk& cart) { replaceText(cart.tagText, step.string()); });
 }
 
-// "acid":
+// "acid".
 
-/// A root note counts when a flag says so.
+/// A flag tells whether the root note is valid.
 void setAcidRoot(MetaEdit& edit, const MetaStep& step)
 {
     changeChunk<AcidChunk>(edit, step, [&](AcidChunk& acid) {
@@ -112,7 +112,7 @@ void setAcidRoot(MetaEdit& edit, const MetaStep& step)
     });
 }
 
-// "smpl":
+// "smpl".
 
 void setSMPTEFormat(MetaEdit& edit, const MetaStep& step)
 {
@@ -135,7 +135,7 @@ void setLoop(MetaEdit& edit, const MetaStep& step)
                 MetaEdit::refuse(step, "a new loop needs its start and its end");
             if (sampler.missingLoops != 0)
                 MetaEdit::refuseDamaged(fourCC("smpl"));
-            std::uint32_t id = 0; // of a point that others may make for it, and of no other
+            std::uint32_t id = 0; // of a point that could be made for it alone
             for (const SamplerLoop& each : sampler.loops)
                 id = std::max<std::uint32_t>(id, each.cueId + 1);
             sampler.loops.emplace_back().cueId = freeCueId(edit, id);
@@ -161,9 +161,9 @@ void removeLoop(MetaEdit& edit, const MetaStep& step)
     });
 }
 
-// "MD5 ":
+// "MD5 ".
 
-/// Stored the other way round than it is written, as a number that is little-endian.
+/// Stored in reverse order, as a little-endian number.
 void setDigest(MetaEdit& edit, const MetaStep& step)
 {
     const auto* const digest = std::get_if<Bytes>(&step.value);

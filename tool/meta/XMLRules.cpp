@@ -1,4 +1,4 @@
-// How fields of "iXML" are set, by the path of their element.
+// Sets fields of "iXML" by the path of their element.
 #include "tool/meta/MetaEdit.h"
 #include "tool/meta/XMLText.h"
 
@@ -14,12 +14,12 @@ bool isAttribute(const MetaName::Part& part)
     return part.name.starts_with('@');
 }
 
-/// The element at the step's path, made where it is to be set; null of a removal of what is not there.
+/// The element at the step's path, created if it is to be set; null when removing one that does not exist.
 const XMLElement* elementOf(MetaEdit& edit, const MetaStep& step, XMLText& document)
 {
     const auto& parts = step.name.parts;
     const std::size_t depth = parts.size() - (isAttribute(parts.back()) ? 1 : 0);
-    // From the root for each part, since what is added moves all that follows.
+    // Starts at the root for each part, because an insertion moves everything after it.
     std::vector<std::size_t> path;
     const auto elementAt = [&] {
         const XMLElement* element = &document.root();
@@ -75,7 +75,7 @@ void setElement(MetaEdit& edit, const MetaStep& step)
     } else {
         document.setContent(*element, step.string());
     }
-    // What is shorter is filled up as its writer does, so that it keeps its place.
+    // A shorter document is padded as its writer does, so that it keeps its place.
     Bytes after(bytesOf(document.text()).begin(), bytesOf(document.text()).end());
     if (chunk == nullptr) {
         edit.add(kIXML, std::move(after));

@@ -24,7 +24,7 @@ bool isWellFormed(const std::string& document)
     return platform::XMLParser(stream, handler).parse();
 }
 
-/// The name of the encoding that the declaration states; empty where it states none.
+/// The encoding in the declaration; empty if it states none.
 std::string_view encodingOf(std::string_view document)
 {
     if (!document.starts_with("<?xml"))
@@ -38,7 +38,7 @@ std::string_view encodingOf(std::string_view document)
     return document.substr(quote + 1, end - quote - 1);
 }
 
-/// Of a tag that is well-formed: its attributes, and the place behind its ">".
+/// Scans a well-formed tag: its attributes, and the position after its ">".
 std::size_t scanTag(std::string_view text, std::size_t at, XMLElement& element)
 {
     for (;;) {
@@ -56,7 +56,7 @@ std::size_t scanTag(std::string_view text, std::size_t at, XMLElement& element)
     }
 }
 
-/// Behind a comment, a section of characters or an instruction that begins here; npos where an element's tag does.
+/// The end of a comment, CDATA section or instruction that begins here; npos if it is an element's tag.
 std::size_t behindOther(std::string_view text, std::size_t at)
 {
     using namespace std::string_view_literals;
@@ -121,7 +121,7 @@ void XMLText::scan()
 
 void XMLText::change(std::size_t begin, std::size_t end, std::string_view by)
 {
-    text_.replace(begin, end - begin, std::string(by)); // a copy: `by` may look at the text
+    text_.replace(begin, end - begin, std::string(by)); // a copy, because `by` may refer to the text
     scan();
 }
 
@@ -177,7 +177,7 @@ void XMLText::setAttribute(const XMLElement& element, std::string_view name, std
     change(found->begin, found->end, text);
 }
 
-/// Names are looked for as they are typed, in UTF-8, and so they are not found in other encodings.
+/// Names are searched for in UTF-8, as typed, so they are not found in other encodings.
 void XMLText::requireWritable(std::string_view name) const
 {
     if (!takesUTF8_ && std::ranges::any_of(name, [](char c) { return static_cast<unsigned char>(c) >= 0x80; }))

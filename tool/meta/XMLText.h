@@ -1,4 +1,4 @@
-// An XML document edited as text: what is not named stays as it is, to the byte.
+// Edits an XML document as text: everything that is not named stays as it is, to the byte.
 #pragma once
 
 #include <cstddef>
@@ -6,7 +6,7 @@
 #include <string_view>
 #include <vector>
 
-/// Where one element stands in the text of a document.
+/// Position of an element in a document's text.
 struct XMLElement {
     struct Attribute {
         std::string_view name;
@@ -14,33 +14,33 @@ struct XMLElement {
     };
 
     std::string_view name;
-    std::size_t begin = 0;      // of the tag that opens it
-    std::size_t content = 0;    // behind that tag
-    std::size_t contentEnd = 0; // where the tag that closes it begins
-    std::size_t end = 0;        // behind that; as `content` of a tag that is both
+    std::size_t begin = 0;      // start of the opening tag
+    std::size_t content = 0;    // end of the opening tag
+    std::size_t contentEnd = 0; // start of the closing tag
+    std::size_t end = 0;        // its end; equals `content` for an empty-element tag
     std::vector<Attribute> attributes;
     std::vector<XMLElement> children;
 
     bool isOneTag() const { return content == end; }
-    /// In the order of the document.
+    /// In document order.
     std::vector<const XMLElement*> named(std::string_view child) const;
 };
 
 class XMLText {
 public:
-    /// Throws Failure for what is not well-formed, has a DOCTYPE, or is in an encoding that is no superset of ASCII.
+    /// Throws Failure if the document is not well-formed, has a DOCTYPE, or its encoding is no superset of ASCII.
     explicit XMLText(std::string document);
 
     const std::string& text() const { return text_; }
-    /// Its names look at the text, until that is changed.
+    /// Its names refer to the text and are valid until that changes.
     const XMLElement& root() const { return root_; }
 
-    // Each reads the document anew; elements are those of the document as it was.
+    // Each parses the document again; elements are those from before.
 
-    /// In the place of all that the element holds.
+    /// Replaces the element's whole content.
     void setContent(const XMLElement& element, std::string_view value);
     void setAttribute(const XMLElement& element, std::string_view name, std::string_view value);
-    /// Behind the last child, set off as that is.
+    /// Adds a child after the last one, with the same indentation.
     void addChild(const XMLElement& parent, std::string_view name);
     void remove(const XMLElement& element);
     void removeAttribute(const XMLElement& element, std::string_view name);
@@ -53,8 +53,8 @@ private:
 
     std::string text_;
     XMLElement root_;
-    bool takesUTF8_ = true; // else what is not ASCII becomes references
+    bool takesUTF8_ = true; // otherwise non-ASCII characters become references
 };
 
-/// Whether it can name an element or an attribute.
+/// Whether the text can name an element or attribute.
 bool isXMLName(std::string_view name);

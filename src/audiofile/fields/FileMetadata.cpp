@@ -12,12 +12,12 @@
 
 namespace {
 
-constexpr std::int64_t kMostBytes = 64 << 20;  // of all chunks that are held whole: an ID3 tag has large pictures
-constexpr std::int64_t kMostOfText = 16 << 20; // of one
-constexpr std::int64_t kMostOfList = 2 << 20;  // of one of numbers, of which fields are fifty times as large
-constexpr std::int64_t kHead = 64;             // of the others
+constexpr std::int64_t kMostBytes = 64 << 20;  // of all chunks held whole; an ID3 tag may contain large pictures
+constexpr std::int64_t kMostOfText = 16 << 20; // per chunk of text
+constexpr std::int64_t kMostOfList = 2 << 20;  // per chunk of numbers, whose fields are fifty times as large
+constexpr std::int64_t kHead = 64;             // of other chunks
 
-// What `info` and `chunks` tell of: coding, samples, room that is not used.
+// Left to `info` and `chunks`: coding, samples, unused room.
 constexpr std::array kStructure{fourCC("fmt "), fourCC("data"), fourCC("ds64"), fourCC("COMM"), fourCC("SSND"),
                                 fourCC("FVER"), fourCC("desc"), fourCC("pakt"), fourCC("kuki"), fourCC("JUNK"),
                                 fourCC("junk"), fourCC("PAD "), fourCC("FLLR"), fourCC("free")};
@@ -41,7 +41,7 @@ std::string lowered(std::string_view text)
     return small;
 }
 
-/// Spaces belong to an id, not to the name of its fields.
+/// Spaces belong to an id, but not to the name of its fields.
 std::string groupOf(FourCC id)
 {
     const std::string text = fourCCText(id);
@@ -60,7 +60,7 @@ bool isWanted(std::string_view group, const MetaGroups& groups)
     return groups.empty() || std::ranges::any_of(groups, isGroup);
 }
 
-/// Of a LIST only its form says of which group its fields are.
+/// Only the form of a LIST tells the group of its fields.
 bool isWanted(FourCC id, const MetaReader* reader, const MetaGroups& groups)
 {
     if (groups.empty())
@@ -70,7 +70,7 @@ bool isWanted(FourCC id, const MetaReader* reader, const MetaGroups& groups)
     return reader != nullptr ? isWanted(reader->group, groups) : isWanted(groupOf(id), groups);
 }
 
-/// Whether a wanted chunk is read with the help of this one.
+/// Whether reading a wanted chunk requires this one.
 bool isReferredTo(FourCC id, std::span<const MetaReader> readers, const MetaGroups& groups)
 {
     return std::ranges::any_of(readers, [&](const MetaReader& reader) {
@@ -78,7 +78,7 @@ bool isReferredTo(FourCC id, std::span<const MetaReader> readers, const MetaGrou
     });
 }
 
-/// How long a chunk may be that is held whole.
+/// How large a chunk may be to be held whole.
 std::int64_t mostOf(const MetaReader& reader)
 {
     if (reader.read == readPreview)
@@ -99,7 +99,7 @@ bool succeeded(std::int32_t status, platform::Error* error)
     return status == kStatusOK || platform::fail(error, platform::ErrorDomain::status, status, StatusText(status));
 }
 
-/// The chunks that may be metadata, in the order of the file; with `extent` of the container.
+/// Collects the chunks that may be metadata, in file order; sets `extent` to the container's.
 bool collect(CAudioFileIO& file, const MetaGroups& groups, ContainerExtent& extent, MetaSource& source,
              platform::Error* error)
 {
@@ -144,7 +144,7 @@ void readChunk(const MetaChunk& chunk, std::span<const MetaReader> readers, cons
     const MetaReader* const reader = readerOf(chunk.id, readers);
     if (!isWanted(chunk.id, reader, groups))
         return;
-    if (chunk.id == fourCC("LIST")) // its reader says which
+    if (chunk.id == fourCC("LIST")) // the form determines the reader
         fields.enterShared(chunk, "LIST");
     else
         fields.enter(chunk, reader != nullptr ? reader->group : groupOf(chunk.id));
@@ -165,12 +165,12 @@ std::optional<HeldMetadata> holdChunks(CAudioFileIO& file, const MetaGroups& gro
     return held;
 }
 
-/// Headers and the chunks beside them come in one piece, into a block that a thread uses for file after file.
+/// Reads headers and neighbouring chunks at once, into a block that a thread reuses for file after file.
 void readAhead(CAudioFileIO& file)
 {
     constexpr std::size_t size = 4096;
     thread_local auto block = std::make_shared<KTMem>(size);
-    if (block.use_count() > 1) // by a file that is open
+    if (block.use_count() > 1) // in use by a file that is open
         block = std::make_shared<KTMem>(size);
     file.SetCache(block);
 }
@@ -218,7 +218,7 @@ std::optional<FileMetadata> ReadMetadataFields(const CFileRef& ref, const MetaGr
 
 std::vector<std::string> MetadataGroupNames()
 {
-    std::set<std::string> groups{"info"}; // with "adtl", which goes to "cue", a LIST
+    std::set<std::string> groups{"info"}; // "adtl" is a LIST too, but belongs to "cue"
     for (const auto& readers : {waveReaders(), aiffReaders(), cafReaders()})
         for (const MetaReader& reader : readers)
             groups.insert(lowered(reader.group));

@@ -34,7 +34,7 @@ constexpr LoopTagField kFields[] = {
     {"transients", "transients", nullptr, Kind::transients},
 };
 
-/// Labels are names too: without regard to case, and to what joins their words.
+/// Labels work as names: case and the characters between words are ignored.
 bool isSameName(std::string_view a, std::string_view b)
 {
     const auto letters = [](std::string_view name) {

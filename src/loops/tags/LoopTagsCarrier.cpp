@@ -74,7 +74,7 @@ void LoopTagsCarrier::carryNumbers(const std::vector<const LoopTagField*>& field
         return;
     const std::string name = fields.size() == 1 ? fields.front()->name : "signature";
     if (name == "loopFileType") {
-        // A CAF file neither keeps it nor has one: what it is follows from the other tags.
+        // A CAF file does not store it; it follows from the other tags.
         const bool isKnown = !isAbsentLoopTag(loopValueUnder(combinedLoopTagsOf(to_), fields.front()->key));
         if (to_.fileType == kAIFF && (isSameKind_ || tags_.number(fields.front()->key) == 1 || !isKnown))
             assign(assignments, true);
@@ -147,7 +147,7 @@ void LoopTagsCarrier::carryDescriptors(const LoopTagField& field)
         lose(field.name, std::to_string(count), why_);
 }
 
-// Whether a file of the kind gives it back, were it the only one.
+// Whether a file of that kind returns the descriptor, if it were the only one.
 bool LoopTagsCarrier::isKept(const LoopTagField& field, const std::string& descriptor) const
 {
     RawLoopTags alone;
@@ -157,7 +157,7 @@ bool LoopTagsCarrier::isKept(const LoopTagField& field, const std::string& descr
     return loopValueUnder(combinedLoopTagsOf(alone), field.key) == assignment.value;
 }
 
-// False when there is no room for it; then all is as before.
+// False if there is no room; then nothing has changed.
 bool LoopTagsCarrier::assign(std::span<const LoopTagAssignment> assignments, bool mustBeRead)
 {
     RawLoopTags bytes = to_;

@@ -1,5 +1,5 @@
-// Tags and texts of one file put into the chunks of another: as they stand between files of one kind, by what they say
-// between AIFF and CAF.
+// Writes tags and texts of one file into the chunks of another: as they stand between files of one kind, by their
+// meaning between AIFF and CAF.
 #pragma once
 
 #include "loops/tags/LoopTags.h"
@@ -8,7 +8,7 @@
 #include <string>
 #include <vector>
 
-/// Each field for itself: one that cannot be kept is told, and costs nothing but itself.
+/// Treats each field separately: one that cannot be kept is reported and does not affect others.
 class LoopTagsCarrier {
 public:
     /// `tags` and `from` are of the same file.
@@ -29,5 +29,5 @@ private:
     RawLoopTags& to_;
     std::vector<std::string>& notKept_;
     bool isSameKind_;
-    std::string why_; // the last assignment that failed did
+    std::string why_; // reason of the last assignment that failed
 };

@@ -23,7 +23,7 @@ bool canHold(FourCC fileType, const VireoLoopBaseChunk& chunk)
     return fileType == kCaff || chunk.aifChunkID() != 0;
 }
 
-// A list of the source's chunks that differ from what the target has, of the kinds that need no thought.
+// Indices of the source's chunks that differ from the target's, among the kinds that are copied as they are.
 std::vector<std::size_t> differingChunks(const LoopSource& source, VireoLoopChunksManager& target, LoopTagsPlan& plan)
 {
     VireoLoopChunkList there = VireoLoopChunks::Empty();
@@ -52,8 +52,8 @@ std::vector<std::size_t> differingChunks(const LoopSource& source, VireoLoopChun
     return differing;
 }
 
-// AIFF keeps 32 bits of a frame, and a transient whose frame were cut would stand somewhere else. Of a type either
-// keeps 16 bits, with or without a sign.
+// AIFF stores 32 bits of a frame, and a transient whose frame was cut would move. Of a type both containers store 16
+// bits, with or without a sign.
 std::vector<VireoLoopTransient> transientsFor(FourCC fileType, std::vector<VireoLoopTransient> transients,
                                               std::vector<std::string>& notKept)
 {

@@ -12,7 +12,7 @@ using Planner = std::function<std::optional<LoopTagsPlan>(const LoopTags& before
 
 platform::URLRef urlOf(const std::string& path)
 {
-    std::error_code ignored; // an empty path then, of which there is no URL
+    std::error_code ignored; // the path is empty then, and has no URL
     return platform::URL::createWithFileSystemBytes(std::filesystem::absolute(path, ignored).string(), false);
 }
 
@@ -21,7 +21,7 @@ bool failFor(platform::Error* error, std::int32_t status, const std::string& des
     return platform::fail(error, platform::ErrorDomain::status, status, description);
 }
 
-// What is wrong with a copy of the file is told by `error`, and needs no status of the edit's.
+// `error` describes problems of the copy, so that the edit needs no status of its own.
 std::optional<EditedLoopTags> edited(const std::string& path, const Planner& planner,
                                      const CoordinatedEditOptions& options, platform::Error* error)
 {

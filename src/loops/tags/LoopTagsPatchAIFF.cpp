@@ -23,7 +23,7 @@ bool isZeroFrom(BytesView bytes, std::size_t start)
                                [](std::byte b) { return b == std::byte{}; });
 }
 
-// A new chunk of version 1.
+// A new chunk, of version 1.
 Bytes newChunk(std::size_t size)
 {
     Bytes bytes(size);
@@ -109,7 +109,7 @@ void storeField(std::byte* field, std::string_view text)
     std::memcpy(field, text.data(), std::min(text.size(), kCategoryTextSize - 1));
 }
 
-// The fields of the descriptors, and where what lies behind them begins.
+// The descriptors' fields, and where the bytes after them begin.
 struct DescriptorFields {
     std::vector<std::string> texts;
     std::size_t end;
@@ -172,15 +172,15 @@ bool assignCategory(std::optional<Bytes>& chunk, const LoopTagField& field, cons
     return true;
 }
 
-// AIFF "COMT": a count, then for each comment a time stamp (4 bytes), a marker (2), the text's size (2) and the text,
-// which a further comment follows at an even place.
+// AIFF "COMT": a count, then for each comment a time stamp (4 bytes), a marker (2), the text's size (2) and the text;
+// the next comment begins at an even offset.
 
 constexpr std::size_t kCommentSizeAt = 8;
 constexpr std::size_t kCommentTextAt = 10;
 
 struct FirstComment {
     std::string_view text; // as it stands
-    std::size_t next;      // where what lies behind it begins
+    std::size_t next;      // start of what follows
 };
 
 std::optional<FirstComment> firstComment(BytesView chunk)
@@ -192,7 +192,7 @@ std::optional<FirstComment> firstComment(BytesView chunk)
                         std::min(kCommentTextAt + size + (size & 1), chunk.size())};
 }
 
-// None when no comment is left.
+// None if no comment is left.
 std::optional<Bytes> assignedComment(const std::optional<Bytes>& chunk, const std::string& text)
 {
     using Types = VireoLoopFileInfoChunkDataTypes;
@@ -208,7 +208,7 @@ std::optional<Bytes> assignedComment(const std::optional<Bytes>& chunk, const st
     if (!isAlone) {
         const std::size_t size = text.empty() ? 0 : loadBE<std::uint16_t>(bytes.data() + kCommentSizeAt);
         storeBE(bytes.data() + kCommentSizeAt, static_cast<std::uint16_t>(size));
-        bytes.resize(kCommentTextAt + size + (size & 1)); // a zero byte of those behind the text is the pad byte
+        bytes.resize(kCommentTextAt + size + (size & 1)); // one of the zero bytes after the text is the pad byte
         bytes.insert(bytes.end(), chunk->begin() + static_cast<std::ptrdiff_t>(old->next), chunk->end());
     }
     std::copy_n(chunk->begin(), kCommentSizeAt, bytes.begin()); // count, time stamp and marker

@@ -14,7 +14,7 @@ namespace {
 constexpr FourCC kInfo = fourCC("info");
 constexpr std::string_view kDescriptors = VireoLoopCombinedTagsChunkDataDescriptorsKey;
 
-// The pair that holds the field; both parts of a signature are in one. Null for the file type, which none holds.
+// The pair that holds the field; both parts of a signature share one. Null for the file type, which has none.
 const char* cafKeyOf(const LoopTagField& field)
 {
     static constexpr std::pair<std::string_view, const char*> keys[] = {
@@ -29,14 +29,14 @@ const char* cafKeyOf(const LoopTagField& field)
         {kDescriptors, "descriptors"},
     };
     if (field.isFileInfo)
-        return field.name; // the names are those of the pairs
+        return field.name; // pairs have the same names
     for (const auto& [key, name] : keys)
         if (field.key != nullptr && key == field.key)
             return name;
     return nullptr;
 }
 
-// The text that stands for a value; empty when none does.
+// The text that stands for a value; empty if there is none.
 std::string cafText(const LoopTagField& field, const Value& value)
 {
     const std::int64_t number = assignedLoopNumber(value);
@@ -57,7 +57,7 @@ std::string cafText(const LoopTagField& field, const Value& value)
     return std::string(number > 0 ? VireoLoopModeName(number) : "");
 }
 
-// Nothing changes where the library reads what is asked for already; a text is compared as it stands.
+// Changes nothing if the library reads the requested value already; texts are compared byte by byte.
 void assignPair(CAFTextPairs& pairs, const platform::Dictionary& read, const LoopTagField& field, const Value& value)
 {
     const std::string text = cafText(field, value);

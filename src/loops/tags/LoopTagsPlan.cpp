@@ -16,7 +16,7 @@ const Value* find(const std::vector<LoopTagValue>& tags, const std::string& name
     return found != tags.end() ? &found->value : nullptr;
 }
 
-// Every member once, in the order of `after`, then what only `before` has.
+// Every member once, in the order of `after`, followed by those that only `before` has.
 void addDifferences(const std::vector<LoopTagValue>& before, const std::vector<LoopTagValue>& after,
                     std::vector<LoopTagChange>& changes)
 {

@@ -1,4 +1,4 @@
-// What a file is read by, and which of its chunks say what.
+// How a file is read, and which of its chunks hold what.
 #include "audiofile/CAudioFileIO.h"
 #include "loops/VireoLoopUserDataUtils.h"
 #include "loops/tags/LoopTagFields.h"
@@ -31,10 +31,10 @@ void readLength(AudioFile& file, const platform::URLRef& url, LoopTags& tags)
     tags.frames = packets * format.framesPerPacket;
     CAudioFileIO description;
     if (!format.isLinearPCM() && description.Open(CFileRef(url), 0) == kStatusOK)
-        tags.frames = static_cast<std::uint64_t>(description.Info().frames); // without what fills packets up
+        tags.frames = static_cast<std::uint64_t>(description.Info().frames); // without padding of packets
 }
 
-// The size of a chunk's body; none when the file does not have it.
+// The size of a chunk's body; none if the file does not have the chunk.
 std::optional<std::uint32_t> sizeOf(const VireoLoopBaseChunk& chunk, AudioFile& file, FourCC fileType)
 {
     const bool aiff = fileType == kAIFF;
@@ -48,7 +48,7 @@ std::optional<std::uint32_t> sizeOf(const VireoLoopBaseChunk& chunk, AudioFile& 
     return byUUID ? size - static_cast<std::uint32_t>(tagging::kUUIDSize) : size;
 }
 
-// An empty chunk of each kind that is carried as it is.
+// An empty chunk of each kind that is carried unchanged.
 VireoLoopChunkList carriedKinds()
 {
     VireoLoopChunkList kinds = VireoLoopChunks::Empty();
@@ -61,7 +61,7 @@ VireoLoopChunkList carriedKinds()
 
 std::vector<LoopTags::Chunk> carriedChunks(AudioFile& file, FourCC fileType)
 {
-    static const VireoLoopChunkList kinds = carriedKinds(); // never changed: the threads of a scan share it
+    static const VireoLoopChunkList kinds = carriedKinds(); // never changes: the threads of a scan share it
     std::vector<LoopTags::Chunk> found;
     for (const auto& chunk : kinds)
         if (const auto size = sizeOf(*chunk, file, fileType))
@@ -69,7 +69,7 @@ std::vector<LoopTags::Chunk> carriedChunks(AudioFile& file, FourCC fileType)
     return found;
 }
 
-// What cannot be opened as an audio file is of another kind.
+// A file that cannot be opened as an audio file counts as one of another kind.
 bool hasOpened(std::int32_t status, platform::Error* error)
 {
     return status == kStatusParameterError ? failWith(error, LoopTagsError::unknownFile, "is no WAVE, AIFF or CAF file")

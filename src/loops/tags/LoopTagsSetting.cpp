@@ -20,7 +20,7 @@ bool isText(const Value& value)
     return text != nullptr && platform::String::fromUTF8(*text);
 }
 
-// The word that stands for a number of a field.
+// The number of a field that a word stands for.
 std::optional<std::int64_t> numberOfWord(const LoopTagField& field, std::string_view word)
 {
     const std::string_view name = field.name;
@@ -47,7 +47,7 @@ std::optional<VireoLoopTransient> transientOf(const Value& value)
                               static_cast<std::uint64_t>(*frame));
 }
 
-// Each frame above the one before.
+// Whether frames ascend.
 bool areTransients(const platform::Array& list)
 {
     std::optional<std::uint64_t> last;
@@ -114,7 +114,7 @@ std::string containerPhrase(FourCC fileType)
     return fileType == kAIFF ? "an AIFF file" : "a CAF file";
 }
 
-// Transients that were there keep their type, unless another one is named.
+// Existing transients keep their type unless another one is given.
 std::vector<VireoLoopTransient> transientsAt(const Value& frames, const LoopTags& before)
 {
     std::vector<VireoLoopTransient> transients;
@@ -148,7 +148,7 @@ bool canHaveTransients(const LoopTags& tags, platform::Error* error)
                     where + "an AIFF file counts no further than " + std::to_string(most));
 }
 
-// Beats make a loop of a file that does not say what it is.
+// Beats make a loop of a file that does not state its kind.
 void makeLoopOfBeats(const LoopTags& before, std::vector<LoopTagAssignment>& assignments)
 {
     const char* const type = VireoLoopCombinedTagsChunkDataFileTypeKey;
@@ -161,11 +161,11 @@ void makeLoopOfBeats(const LoopTags& before, std::vector<LoopTagAssignment>& ass
     if (beats != assignments.end() && !isAbsentLoopTag(beats->value) && named(type) == assignments.end() &&
         before.fileType == kAIFF && isAbsentLoopTag(loopValueUnder(before.combined, type))) {
         assignments.push_back({loopTagFieldsForKey("loopFileType").front(), {}});
-        assignments.back().value = 1; // g++ 12 warns, wrongly, of a value that is moved into the list
+        assignments.back().value = 1; // avoids a false warning of g++ 12 about a value moved into the list
     }
 }
 
-// Whether the tags are read back as they are wanted; those of a CAF file follow in part from others.
+// Whether the tags are read back as requested; some tags of a CAF file follow from others.
 bool areKept(const Dictionary& wanted, const Dictionary& kept, FourCC fileType,
              std::span<const LoopTagAssignment> assignments, platform::Error* error)
 {
@@ -194,7 +194,7 @@ bool areTextsKept(const LoopTags& after, std::span<const LoopTagAssignment> assi
     return true;
 }
 
-// What goes or is replaced though the library could not read it is told as well.
+// Also reports what is removed or replaced although the library could not read it.
 void tellOfUnreadable(const RawLoopTags& before, const std::vector<LoopTagAssignment>& assignments, LoopTagsPlan& plan)
 {
     for (const LoopTagAssignment& assignment : assignments) {
@@ -203,7 +203,7 @@ void tellOfUnreadable(const RawLoopTags& before, const std::vector<LoopTagAssign
         assignLoopTags(alone, {&assignment, 1});
         if (field.kind == LoopTagField::Kind::transients && isAbsentLoopTag(assignment.value))
             alone.transients.reset();
-        // A signature is one thing.
+        // Both parts of a signature count as one tag.
         if (alone == before || field.name == std::string_view("signatureBottom") ||
             std::ranges::any_of(plan.changes, [&](const LoopTagChange& change) { return change.key == field.name; }))
             continue;
@@ -315,13 +315,13 @@ std::optional<LoopTagsPlan> planLoopTagsRemoval(const LoopTags& before, const pl
     plan.after.frames = before.frames;
     plan.changes = loopTagDifferences(before, plan.after);
     plan.bytes.fileType = before.fileType;
-    if (before.fileType == kCaff) { // the other texts of "info" stay as they are
+    if (before.fileType == kCaff) { // other texts of "info" are unchanged
         plan.bytes.texts = bytes->texts;
         for (const LoopTagField& field : loopTagFields())
             if (const LoopTagAssignment removal{&field, {}}; field.isFileInfo)
                 assignLoopTags(plan.bytes, {&removal, 1});
     }
-    if (plan.changes.empty()) { // chunks that say nothing, or that cannot be read
+    if (plan.changes.empty()) { // chunks that say nothing or cannot be read
         for (const LoopTags::Chunk& chunk : loopChunksOf(*manager))
             plan.changes.push_back({chunk.id, std::to_string(chunk.size) + " bytes", {}});
     }

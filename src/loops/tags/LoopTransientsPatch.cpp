@@ -14,7 +14,7 @@ using tagging::TransientsChunk;
 
 namespace {
 
-// Both layouts are a head that ends with the count, and records that begin with a type.
+// Both layouts have a head that ends with the count, and records that begin with a type.
 struct Layout {
     std::size_t headSize, recordSize;
     std::size_t versionAt, detectionAt, divisionAt, frameAt;
@@ -70,7 +70,7 @@ bool canBeRead(const RawLoopTags& tags)
     return tags.transients && tags.transients->size() >= layoutOf(tags.fileType).headSize;
 }
 
-// The time of writing is that of the list.
+// The time stamp applies to the whole list.
 void setTime(Bytes& chunk, const Layout& layout)
 {
     if (layout.isAIFF)
@@ -104,7 +104,7 @@ void assignLoopTransients(RawLoopTags& tags, const std::vector<VireoLoopTransien
     }
     layout.setCount(bytes, transients.size());
     setTime(bytes, layout);
-    if (claimed <= room) // else the last record is cut
+    if (claimed <= room) // otherwise the last record is cut
         bytes.insert(bytes.end(), firstRecord + records * layout.recordSize,
                      static_cast<const std::byte*>(old.data()) + old.size());
     if (transients.empty())

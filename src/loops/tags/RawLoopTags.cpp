@@ -13,7 +13,7 @@ namespace {
 
 constexpr FourCC kInfoChunk = fourCC("info");
 
-// The item at an index, if there is one. False for what cannot be read, which is no item that is not there.
+// The item at an index, if it exists. False if it cannot be read, which differs from a missing item.
 bool readItem(AudioFile& file, FourCC type, std::uint32_t index, std::optional<Bytes>& item, platform::Error* error)
 {
     std::uint32_t size = 0;
@@ -30,7 +30,7 @@ bool readItem(AudioFile& file, FourCC type, std::uint32_t index, std::optional<B
     return true;
 }
 
-// The same of a CAF file's "uuid" items, without the UUID.
+// As above for a CAF file's "uuid" items, without the UUID.
 bool readItemWithUUID(AudioFile& file, const tagging::UUIDBytes& uuid, std::optional<Bytes>& item,
                       platform::Error* error)
 {

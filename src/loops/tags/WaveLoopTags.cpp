@@ -20,7 +20,7 @@ constexpr FourCC kAcid = fourCC("acid");
 constexpr FourCC kSampler = fourCC("smpl");
 constexpr std::int64_t kLoop = 1, kNoLoop = 2; // of loopFileType
 
-// The chunk that is there, or a new one; none of one that is cut short.
+// The existing chunk, or a new one; none if it is cut short.
 template <class Chunk>
 std::optional<Chunk> chunkIn(const RawLoopTags& tags, FourCC id, const Chunk& fresh, platform::Error* error)
 {
@@ -40,14 +40,14 @@ std::int64_t kindOf(const LoopTags& tags)
     return kind == 0 && tags.number(VireoLoopCombinedTagsChunkDataBeatCountKey) > 0 ? kLoop : kind;
 }
 
-// That of the source, in whatever octave.
+// The source's root note in any octave.
 std::int64_t rootOf(const LoopTags& tags)
 {
     return tags.sampler.rootNote ? tags.sampler.rootNote->value
                                  : tags.number(VireoLoopCombinedTagsChunkDataMidiRootNoteKey);
 }
 
-// As stated where the sound is as long; else what the beats make in the sound that is there.
+// The stated tempo if the sound has the source's length, else the tempo that its beats have in the target's sound.
 float tempoIn(const LoopTags& source, const LoopTags& target)
 {
     const double computed =
@@ -68,7 +68,7 @@ bool assignAcid(RawLoopTags& chunks, const LoopTags& source, const LoopTags& tar
                        kind = kindOf(source);
     const bool hasSignature = top > 0 && bottom > 0 && top <= most && bottom <= most;
     const bool hasRoot = root > 0 && root <= 127;
-    // For a root note alone "smpl" is enough.
+    // A root note alone needs only "smpl".
     if (beats <= 0 && kind == 0 && !hasSignature && (!hasRoot || !chunks.texts.contains(kAcid)))
         return true;
     AcidChunk fresh;
@@ -124,7 +124,7 @@ bool assignSampler(RawLoopTags& chunks, const LoopTags& source, const LoopTags& 
     const bool isNew = !chunks.texts.contains(kSampler);
     if ((root <= 0 || root > 127) && (!isNew || source.sampler.loops.empty()))
         return true;
-    constexpr std::uint32_t middleC = 60; // where nobody chose a note
+    constexpr std::uint32_t middleC = 60; // if nobody chose a note
     constexpr double nanoseconds = 1e9;
     SamplerChunk fresh;
     fresh.midiUnityNote = middleC;
@@ -185,7 +185,7 @@ std::vector<std::string> loopTagsLostInWave(const LoopTags& source, const LoopTa
     std::vector<std::string> lost;
     for (const LoopTagField& field : loopTagFields()) {
         const platform::Value value = presentValue(source, field);
-        const bool isRoot = field.name == std::string_view("midiRootNote"); // in whatever octave
+        const bool isRoot = field.name == std::string_view("midiRootNote"); // in any octave
         const bool isKept = isRoot ? rootOf(source) == rootOf(after) : value == presentValue(after, field);
         if (!value.isNull() && !isKept && !field.isFileInfo)
             lost.emplace_back(field.name);

@@ -13,7 +13,7 @@ namespace {
 
 static_assert(PolyphaseRun::kSideBySide == sizeof(__m512) / sizeof(float));
 
-/// The sums of two channels, each added up in the plain road's order, in the lowest numbers of both halves.
+/// The totals of two channels, added in the plain road's order, in the lowest elements of both halves.
 KT_WIDE_VECTORS inline __m256 totals(__m512 a, __m512 b)
 {
     const __m512 fourths = _mm512_add_ps(_mm512_shuffle_f32x4(a, b, 0x44), _mm512_shuffle_f32x4(a, b, 0xEE));

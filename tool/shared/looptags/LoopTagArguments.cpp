@@ -40,7 +40,7 @@ std::string_view trimmed(std::string_view text)
     return text.substr(start, text.find_last_not_of(kWhite) + 1 - start);
 }
 
-// A text between white space, or what a quoted one stands for.
+// A text without white space around it, or the meaning of a quoted one.
 std::string meantText(std::string_view text)
 {
     text = trimmed(text);
@@ -52,7 +52,7 @@ std::string meantText(std::string_view text)
     return meant;
 }
 
-// The members of a list, between commas; those that are quoted may hold some.
+// The members of a list, separated by commas; quoted members may contain commas.
 std::set<std::string> members(std::string_view text)
 {
     std::set<std::string> each;
@@ -76,7 +76,7 @@ std::optional<std::int64_t> integer(std::string_view text)
     return result.ec == std::errc() && result.ptr == text.data() + text.size() ? std::optional(number) : std::nullopt;
 }
 
-// The words that stand for a field's numbers: notes, any of the names for the same key ("F#" and "Gb"), modes, kinds.
+// Words for a field's numbers: notes under any name of the key ("F#" and "Gb"), modes, kinds.
 std::optional<std::int64_t> numberOfWord(const LoopTagField& field, std::string_view text)
 {
     const std::string_view name = field.name;
@@ -182,7 +182,7 @@ std::string suggestion(std::string_view key)
     return didYouMean(key, words);
 }
 
-// What `tags` shows and nobody can set.
+// Refuses names that `tags` shows but that cannot be set.
 void refuseShown(std::string_view key, std::string_view text)
 {
     if (equalIgnoringASCIICase(key, "tempo") || equalIgnoringASCIICase(key, "bpm"))
@@ -194,14 +194,14 @@ void refuseShown(std::string_view key, std::string_view text)
             refuse(fmt::format("{} cannot be set; tags copy carries what belongs to a loop to another file", shown));
 }
 
-// The parts of a key by the fields that they are for: a note, with a mode behind it or without, or a mode alone.
+// Splits a key into its fields: a note with or without a mode, or only a mode.
 std::vector<LoopTagAssignment> keyParts(std::string_view text, const std::vector<const LoopTagField*>& fields)
 {
     const LoopTagField& root = *fields[0];
     const LoopTagField& mode = *fields[1];
     if (const auto alone = numberOfWord(mode, text); alone && text != "m")
         return {{&mode, *alone}};
-    for (std::size_t end = text.size(); end > 0; --end) { // the longest that is a note: "Bb" is no "B"
+    for (std::size_t end = text.size(); end > 0; --end) { // the longest note first: "Bb" is not "B"
         const auto note = numberOf(root, text.substr(0, end));
         const std::string_view behind = trimmed(text.substr(end));
         const auto type = numberOf(mode, behind);
@@ -254,7 +254,7 @@ bool holdsUTF8(const Value& value)
            (list == nullptr || std::ranges::all_of(*list, holdsUTF8));
 }
 
-// Notes by which a key may be called: "C" is one for 48, and 60 says more of which it is.
+// Whether two notes name the same key: "C" stands for 48, and 60 specifies the octave.
 bool isSameNote(const LoopTagAssignment& a, const LoopTagAssignment& b)
 {
     const auto* const first = a.value.get<std::int64_t>();
@@ -263,7 +263,7 @@ bool isSameNote(const LoopTagAssignment& a, const LoopTagAssignment& b)
            *second > 0 && (*first - *second) % 12 == 0;
 }
 
-// JSON has a key in words and in numbers, which may both be given.
+// JSON has a key both in words and in numbers, so both may be given.
 void assign(std::vector<LoopTagAssignment>& assignments, std::string_view key, std::string_view text)
 {
     for (LoopTagAssignment& part : assignmentsOf(key, text)) {
@@ -303,7 +303,7 @@ TagArguments parseKeys(std::span<const std::string> arguments)
     for (const std::string& argument : arguments) {
         const auto fields = loopTagFieldsForKey(argument);
         struct stat status = {};
-        // A misspelt key must not pass for a missing file: without keys all tags of the other files would go.
+        // A misspelt key must not pass for a missing file: without keys, all tags of the other files would be removed.
         if (fields.empty() && argument.find('/') == std::string::npos &&
             ::lstat(nameMeantBy(argument).c_str(), &status) != 0)
             refuse(fmt::format("\"{}\" is neither a file nor a tag{}; tags are {}", printable(argument),

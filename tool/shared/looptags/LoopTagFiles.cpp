@@ -24,7 +24,7 @@ void failForTags(const std::string& path, const platform::Error& error)
     if (is(LoopTagsError::otherFile))
         throw OtherKind(error.description, OtherKind::Kind::audio);
     if (!isOurs || is(LoopTagsError::unknownFile))
-        requireRegularFile(path); // says best what is wrong with it
+        requireRegularFile(path); // knows best what is wrong with it
     if (is(LoopTagsError::unknownFile)) {
         requireKnown(path);
         throw OtherKind(error.description, OtherKind::Kind::unknown);

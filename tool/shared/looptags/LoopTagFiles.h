@@ -1,4 +1,4 @@
-// The library's loop tags of files that are named on the command line, with its errors as Failures.
+// The library's loop tags for files named on the command line; its errors become Failures.
 #pragma once
 
 #include "loops/tags/LoopTagsPlan.h"
@@ -6,7 +6,7 @@
 
 #include <string>
 
-/// Throws the Failure of an error about the file; for one of another kind OtherKind.
+/// Throws the Failure of an error about the file; OtherKind if the file is of another kind.
 [[noreturn]] void failForTags(const std::string& path, const platform::Error& error);
 
 /// As readLoopTags and readOwnLoopTags; throw Failure.

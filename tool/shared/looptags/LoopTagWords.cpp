@@ -19,7 +19,7 @@ std::string noteName(std::int64_t note)
     return name.empty() ? std::to_string(note) : std::string(name);
 }
 
-// "minor", "major"; the number for what is neither.
+// "minor", "major"; otherwise the number.
 std::string modeName(std::int64_t keyType)
 {
     const std::string_view name = VireoLoopModeName(keyType);
@@ -39,7 +39,7 @@ std::string keyText(const LoopTags& tags)
     return noteName(note) + (mode.empty() ? "" : " " + mode);
 }
 
-// Notes of other octaves have the same names; which one it is stands behind.
+// Notes in different octaves have the same name, so the note number follows.
 std::string keyInWords(const LoopTags& tags)
 {
     const std::string words = keyWords(tags);
@@ -90,7 +90,7 @@ std::string kindText(const LoopTags& tags)
     return type == 1 ? "loop" : type == 2 ? "not a loop" : numberText(type);
 }
 
-// Frames, each with its type unless that is the usual one.
+// Frames, each with its type unless it is the usual one.
 std::string transientsText(const LoopTags& tags)
 {
     std::string text;
@@ -139,12 +139,12 @@ std::string text(const LoopTags& tags)
     return quotedText(tags.text(key));
 }
 
-// What is shown of a loop, in order.
+// The tags shown for a loop, in order.
 struct ShownTag {
     const char* name;
     const char* label;
     TagText text;
-    TagText brief = nullptr; // null: the same
+    TagText brief = nullptr; // null: the same text
 };
 const ShownTag kShownTags[] = {
     {"tempo", "Tempo", tempoText},
@@ -198,7 +198,7 @@ void writeSamplerLists(JsonWriter& json, const SamplerTags& sampler)
     }
 }
 
-// Of what is made of several values, where the first one comes from. Nothing is said of loop chunks, which are the rule
+// For tags combined from several values, the source of the first. Loop chunks are not named, because they are the rule
 // in AIFF and CAF files.
 std::string sourceOf(const LoopTags& tags, std::string_view name)
 {

@@ -1,9 +1,9 @@
-// The loop tags of files as rows of CSV.
+// Loop tags of files as CSV rows.
 #pragma once
 
 #include "loops/tags/LoopTags.h"
 #include "tool/shared/output/CsvRecords.h"
 
 CsvColumns loopColumns();
-/// Of transients and markers their number, of chunks their ids, of loops "FIRST-LAST", of sources "NAME=CHUNK".
+/// Transients and markers as a number, chunks as ids, loops as "FIRST-LAST", sources as "NAME=CHUNK".
 std::string loopRow(const std::string& path, const LoopTags& tags);

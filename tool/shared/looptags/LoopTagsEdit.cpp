@@ -114,8 +114,7 @@ private:
     JsonRecords json_;
 };
 
-// A tag that was asked for and cannot be kept is a mistake on the command line; one that would be lost on the way makes
-// the edit fail.
+// A requested tag that cannot be kept is a usage error; one that would be lost as a side effect makes the edit fail.
 LoopTagsPlan planned(const TagsEditor& editor, const std::string& path)
 {
     platform::Error error;

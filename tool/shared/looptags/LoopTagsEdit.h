@@ -1,4 +1,4 @@
-// Edits of loop tags by the verbs: worked out by the library, written by way of SafeEdit, and reported.
+// Edits of loop tags for the verbs: worked out by the library, written through SafeEdit, and reported.
 #pragma once
 
 #include "loops/tags/LoopTagsPlan.h"
@@ -9,7 +9,7 @@
 #include <functional>
 #include <string>
 
-/// A verb that edits. `action` is its name for JSON.
+/// A verb that edits. `action` is its name in JSON.
 struct TagsEditor {
     const char* action;
     const char* done;   // "set"
@@ -20,6 +20,6 @@ struct TagsEditor {
         plan;
 };
 
-/// Edits one file after the other and reports each; false when one failed. Mistakes on the command line that show only
-/// in the light of a file are found before the first file is touched.
+/// Edits file after file and reports each; false if one failed. Usage errors that depend on a file are found before the
+/// first file is changed.
 bool editTags(const FileArguments& files, const TagsEditor& editor, EditOptions edit, const OutputOptions& output);

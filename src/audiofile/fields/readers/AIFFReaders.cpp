@@ -1,4 +1,4 @@
-// Metadata of AIFF and AIFC.
+// Reads the metadata of AIFF and AIFC.
 #include "audiofile/fields/readers/MetaReaders.h"
 #include "audiofile/metadata/AIFFInstrumentChunk.h"
 #include "audiofile/metadata/CommentList.h"
@@ -48,7 +48,7 @@ bool readMarkers(const MetaChunk& chunk, const MetaSource&, MetaFields& fields)
     return true;
 }
 
-/// A loop, with the places that its markers have.
+/// Adds a loop with the positions of its markers.
 void addLoop(const std::string& name, const AIFFLoop& loop, const MetaSource& source, MetaFields& fields)
 {
     constexpr std::array<std::string_view, 3> words{"none", "forward", "forward and backward"};

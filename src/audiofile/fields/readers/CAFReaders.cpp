@@ -1,4 +1,4 @@
-// Metadata of CAF.
+// Reads the metadata of CAF.
 #include "audiofile/fields/readers/MetaReaders.h"
 #include "audiofile/metadata/CAFInstrumentChunk.h"
 #include "audiofile/metadata/CAFMarkers.h"
@@ -22,7 +22,7 @@ bool readStrings(const MetaChunk& chunk, const MetaSource&, MetaFields& fields)
     const auto table = CAFStringTable::read(chunk.body);
     if (!table)
         return false;
-    std::size_t size = 0; // texts may overlap: not more of them than the chunk has bytes
+    std::size_t size = 0; // texts may overlap; at most the size of the chunk
     for (std::size_t i = 0; i < table->entries.size(); ++i) {
         fields.number(itemName("", i) + "id", std::uint32_t{table->entries[i].id});
         const auto text = size < chunk.body.size() ? table->textOf(table->entries[i]) : std::nullopt;
@@ -141,7 +141,7 @@ bool readChannels(const MetaChunk& chunk, const MetaSource&, MetaFields& fields)
     return true;
 }
 
-/// "peak": the number of edits that it is true for, then a value and its frame for each channel.
+/// "peak": the number of edits for which it is valid, then a value and its frame for each channel.
 bool readPeakPositions(const MetaChunk& chunk, const MetaSource&, MetaFields& fields)
 {
     constexpr std::size_t peakSize = 12;

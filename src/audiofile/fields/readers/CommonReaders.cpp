@@ -30,8 +30,8 @@ std::string clockFields(std::initializer_list<int> numbers)
     return text;
 }
 
-/// SMPTE ST 330: a label, the length of what follows, a number of the instance and one of the material; of 64 bytes
-/// also where and when.
+/// SMPTE ST 330: a label, the length of the rest, an instance number and a material number; with 64 bytes also place
+/// and time.
 void addUMID(const std::string& name, BytesView umid, MetaFields& fields)
 {
     constexpr std::size_t basic = 32;

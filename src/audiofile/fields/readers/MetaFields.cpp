@@ -66,7 +66,7 @@ void MetaFields::enterShared(const MetaChunk& chunk, std::string_view group)
 MetaField& MetaFields::add(std::string_view name, MetaField::Value value)
 {
     MetaField& field = fields_.emplace_back(here_);
-    field.name = platform::decodeFileText(name, fallback_).utf8; // keys are texts of the file too
+    field.name = platform::decodeFileText(name, fallback_).utf8; // keys are texts from the file too
     field.value = std::move(value);
     if (const std::uint32_t count = names_.add(fields_, fields_.size() - 1, placeHash_); count != 0)
         appendIndex(field.name, count);

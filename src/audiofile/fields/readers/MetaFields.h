@@ -1,4 +1,4 @@
-// How fields are collected: as a list of stable names.
+// Collects fields as a list with unique names.
 #pragma once
 
 #include "audiofile/fields/MetaField.h"
@@ -10,29 +10,29 @@
 #include <string_view>
 #include <vector>
 
-/// How many fields of a place have had a name, found by hashes that need no copies of the names.
+/// Counts the fields of a place by name, with hashes instead of copies of the names.
 class MetaNameCounts {
 public:
-    /// Counts one more field, `index` of `fields`, under the name that it has now; returns how many had it before.
+    /// Counts another field, `index` of `fields`, under its present name; returns how many had that name before.
     /// `placeHash` is any hash of its place.
     std::uint32_t add(const std::vector<MetaField>& fields, std::size_t index, std::size_t placeHash);
 
 private:
     struct Slot {
         std::size_t hash = 0;
-        std::uint32_t field = 0; // the first of the name, counted from 1; 0: free
+        std::uint32_t field = 0; // the first with that name, counted from 1; 0 if the slot is free
         std::uint32_t count = 0;
     };
     void grow();
 
-    std::vector<Slot> slots_; // a power of two, at most half of them taken
+    std::vector<Slot> slots_; // a power of two, at most half of them used
     std::size_t taken_ = 0;
 };
 
-/// Collects fields, and gives those of the same name different ones: "info.IART", "info.IART[1]".
+/// Collects fields, and makes equal names unique: "info.IART", "info.IART[1]".
 class MetaFields {
 public:
-    /// The rate tells the time of numbers of frames; 0 where it is not known. Texts that are not UTF-8 are in
+    /// The rate converts numbers of frames to times; 0 if it is unknown. Texts that are not UTF-8 are read as
     /// `fallback`.
     explicit MetaFields(double sampleRate, platform::FallbackEncoding fallback = platform::FallbackEncoding::latin1)
         : sampleRate_(sampleRate),
@@ -41,12 +41,12 @@ public:
         fields_.reserve(kUsualFields);
     }
 
-    /// From now on fields are of this chunk.
+    /// The following fields belong to this chunk.
     void enter(const MetaChunk& chunk, std::string_view group);
-    /// The same, of a chunk that says more of what others tell under the group.
+    /// As above, for a chunk that adds to a group of other chunks.
     void enterShared(const MetaChunk& chunk, std::string_view group);
 
-    /// Nothing for an empty text.
+    /// Ignores an empty text.
     void text(std::string_view name, std::string_view bytes, std::string_view words = "");
     template <class Number>
         requires std::integral<Number> || std::floating_point<Number>
@@ -59,16 +59,16 @@ public:
         else
             add(name, std::int64_t{value}).words = words;
     }
-    /// A place in the sound or a length of it.
+    /// Adds a position or length in the sound.
     void frames(std::string_view name, std::uint64_t frames);
     void frames(std::string_view name, double frames);
-    /// All bytes in hexadecimal.
+    /// Adds all bytes in hexadecimal.
     void hex(std::string_view name, BytesView bytes);
-    /// The first bytes of what is not understood; nothing of no bytes.
+    /// Adds the first bytes of data that is not interpreted; ignores empty data.
     void preview(std::string_view name, BytesView bytes, std::uint64_t size, std::string_view words = "");
-    /// What follows the fields of a chunk: nothing of zeros.
+    /// Adds bytes after the fields of a chunk; ignores zeros.
     void behind(BytesView bytes);
-    /// Nothing of 0.
+    /// Ignores 0.
     void missing(std::uint64_t count);
 
     std::vector<MetaField> take() { return std::move(fields_); }
@@ -80,7 +80,7 @@ private:
 
     double sampleRate_;
     platform::FallbackEncoding fallback_;
-    MetaField here_; // the parts that fields share
+    MetaField here_; // parts that fields share
     std::size_t placeHash_ = 0;
     std::map<std::string, std::size_t> places_;
     MetaNameCounts names_;
@@ -89,5 +89,5 @@ private:
 
 /// `[index]`.
 void appendIndex(std::string& text, std::size_t index);
-/// `name[index].` ahead of the fields of one item of several.
+/// `name[index].`, the start of the names of an item's fields.
 std::string itemName(std::string_view name, std::size_t index);

@@ -1,4 +1,4 @@
-// How the metadata chunks of each container become fields.
+// Turns the metadata chunks of each container into fields.
 #pragma once
 
 #include "audiofile/fields/MetaSource.h"
@@ -9,39 +9,39 @@
 #include <string>
 #include <string_view>
 
-/// Puts what a chunk says into fields. False, with no field, when it is not what its id promises.
+/// Reads the fields of a chunk. False, without a field, if the chunk is not what its id promises.
 using MetaRead = bool (*)(const MetaChunk& chunk, const MetaSource& source, MetaFields& fields);
 
 struct MetaReader {
     FourCC id = 0;
-    std::string_view group; // ahead of the names of its fields
+    std::string_view group; // prefix of the names of its fields
     MetaRead read = nullptr;
-    FourCC refersTo = 0; // the id of the chunk in which it looks up what its own says in numbers
+    FourCC refersTo = 0; // id of the chunk to which its numbers refer
 };
 
-std::span<const MetaReader> waveReaders(); // of RIFF, RF64, BW64, RIFX and Wave64
+std::span<const MetaReader> waveReaders(); // RIFF, RF64, BW64, RIFX and Wave64
 std::span<const MetaReader> aiffReaders();
 std::span<const MetaReader> cafReaders();
 
-// Of several containers:
+// Shared by several containers.
 
-/// XML as fields by the path of each element; as one text where it is not well-formed.
+/// Fields for XML by the path of each element; a single text if it is not well-formed.
 bool readIXML(const MetaChunk& chunk, const MetaSource& source, MetaFields& fields);
-/// How many elements of each kind an ADM document has.
+/// The number of elements of each kind in an ADM document.
 bool readADM(const MetaChunk& chunk, const MetaSource& source, MetaFields& fields);
-/// The whole body up to NULs at its end.
+/// The whole body up to trailing NULs.
 bool readText(const MetaChunk& chunk, const MetaSource& source, MetaFields& fields);
 bool readHex(const MetaChunk& chunk, const MetaSource& source, MetaFields& fields);
 /// SMPTE ST 330, of 32 or 64 bytes.
 bool readUMID(const MetaChunk& chunk, const MetaSource& source, MetaFields& fields);
 bool readID3(const MetaChunk& chunk, const MetaSource& source, MetaFields& fields);
-/// The size and the first bytes of what is for other programs.
+/// Size and first bytes of data for other programs.
 bool readPreview(const MetaChunk& chunk, const MetaSource& source, MetaFields& fields);
-/// "PEAK": the extreme of each channel, with 8 bytes ahead of them.
+/// "PEAK": the extreme of each channel, after 8 other bytes.
 bool readPeaks(const MetaChunk& chunk, const MetaSource& source, MetaFields& fields);
 
-/// All of a UMID of 64 bytes, the second half of which may be zeros, and its parts: "umid", "umidLabel" …
+/// A UMID of 64 bytes, the second half of which may be zeros, as a whole and by parts: "umid", "umidLabel" …
 void addUMID(const std::string& name, BytesView umid, MetaFields& fields);
 bool anySet(BytesView bytes);
-/// "01:02:03:04", of two digits each, and more where it must be.
+/// "01:02:03:04": at least two digits per number.
 std::string clockFields(std::initializer_list<int> numbers);

@@ -11,7 +11,7 @@
 
 namespace {
 
-// The systems of tags, and the groups that their fields are of.
+// Tagging systems, and the groups of their fields.
 constexpr std::array<std::pair<std::string_view, std::string_view>, 7> kSystems = {{{"ID3v1", "id3v1"},
                                                                                     {"ID3v2", "id3v2"},
                                                                                     {"Vorbis comment", "vorbis"},
@@ -26,7 +26,7 @@ std::string_view groupOf(std::string_view system)
     return found == kSystems.end() ? "tag" : found->second;
 }
 
-/// Whether it is an audio file of any kind, whose sound can be had.
+/// Whether it is an audio file of any kind, with sound that can be read.
 bool isAudio(const CFileRef& ref, platform::Error* error)
 {
     const auto fail = [error](std::string description) {

@@ -1,4 +1,4 @@
-// The tags of files that have no chunks: MP3, AAC, FLAC, Ogg, MP4, APE, WavPack, Musepack, ASF, DSF.
+// Reads the tags of files without chunks: MP3, AAC, FLAC, Ogg, MP4, APE, WavPack, Musepack, ASF, DSF.
 #pragma once
 
 #include "audiofile/CAudioFileIO.h"
@@ -8,11 +8,11 @@
 
 #include <span>
 
-/// The values of a tag as fields of what was entered, each under its key.
+/// Adds the values of a tag as fields of the entered chunk, under their keys.
 void addTag(const platform::EmbeddedTag& tag, MetaFields& fields);
 
-/// Of the open file `ref`. None for what is no audio file.
+/// Reads the tags of the open file `ref`. None if it is no audio file.
 std::optional<FileMetadata> readTags(CAudioFileIO& file, const CFileRef& ref, platform::Error* error);
 
-/// The groups of their fields, in small letters.
+/// The groups of the tags' fields, in lower case.
 std::span<const std::string_view> tagGroups();

@@ -1,4 +1,4 @@
-// Metadata of WAVE, RF64, BW64, RIFX and Wave64.
+// Reads the metadata of WAVE, RF64, BW64, RIFX and Wave64.
 #include "audiofile/fields/readers/MetaReaders.h"
 #include "audiofile/metadata/AcidChunk.h"
 #include "audiofile/metadata/AssociatedDataList.h"
@@ -14,7 +14,7 @@
 
 namespace {
 
-/// What the version of a "bext" has no field for: the more, the older it is (EBU Tech 3285).
+/// Adds the bytes of a "bext" that are reserved in its version: the older it is, the more (EBU Tech 3285).
 void addReserved(BytesView body, unsigned version, MetaFields& fields)
 {
     const std::size_t begin = version == 0   ? offsetof(BroadcastFields, umid)
@@ -218,7 +218,7 @@ void addInfo(const InfoList& list, MetaFields& fields)
         fields.text(fourCCText(item.id), textUpToNUL(item.body), InfoList::words(item.id));
 }
 
-/// Names, remarks and ranges stand under the index that their point has in "cue ".
+/// Adds names, remarks and ranges under the index that their point has in "cue ".
 void addAssociatedData(const AssociatedDataList& list, const MetaSource& source, MetaFields& fields)
 {
     const auto& indices = source.cueIndices();
@@ -297,7 +297,7 @@ bool readFact(const MetaChunk& chunk, const MetaSource& source, MetaFields& fiel
     return true;
 }
 
-/// Shown as a digest is written, which is the other way round than it is stored.
+/// Adds the digest in the order in which digests are written, the reverse of how it is stored.
 bool readDigest(const MetaChunk& chunk, const MetaSource&, MetaFields& fields)
 {
     if (chunk.body.size() != 16)

@@ -1,4 +1,4 @@
-// Chunks that hold XML documents.
+// Reads chunks that hold XML documents.
 #include "audiofile/fields/readers/MetaReaders.h"
 #include "platform/XMLParser.h"
 
@@ -14,18 +14,18 @@ struct Element {
     explicit Element(Memory* memory) : text(memory), attributes(memory) {}
 
     std::string_view name;
-    std::pmr::string text; // from its first character that is no blank on
+    std::pmr::string text; // without leading blanks
     std::pmr::vector<std::pair<std::string_view, std::string_view>> attributes;
-    std::size_t depth = 0;              // 0 of the root
-    std::size_t index = 0;              // among those of its name in the same parent
-    const std::size_t* likes = nullptr; // how many those are
-    bool isInList = false;              // its parent's name says so
+    std::size_t depth = 0;              // 0 for the root
+    std::size_t index = 0;              // among siblings of the same name
+    const std::size_t* likes = nullptr; // number of those siblings
+    bool isInList = false;              // according to its parent's name
 };
-using Elements = std::pmr::deque<Element>; // in the order in which they begin; they stay where they are
+using Elements = std::pmr::deque<Element>; // in order of their start; addresses are stable
 
 constexpr std::string_view kBlanks = " \t\r\n";
 
-/// Keeps a document's elements; stops at more of them, or deeper ones, than fields are good for.
+/// Collects a document's elements; stops beyond a sensible number or depth.
 class TreeHandler : public platform::XMLHandler {
 public:
     static constexpr std::size_t kMostElements = 100'000;
@@ -70,15 +70,15 @@ private:
         return {to, text.copy(to, text.size())};
     }
 
-    std::pmr::monotonic_buffer_resource memory_; // given back at once, which so many small pieces are not quickly
+    std::pmr::monotonic_buffer_resource memory_; // freed at once, which is faster than many small pieces
     Elements elements_{&memory_};
     std::pmr::map<std::pair<const Element*, std::string_view>, std::size_t> likes_{&memory_}; // by parent and name
     std::vector<Element*> open_;
-    std::size_t pathLength_ = 0; // of the names of the open elements
+    std::size_t pathLength_ = 0; // length of the names of the open elements
     platform::XMLParser* parser_ = nullptr;
 };
 
-/// Writers fill chunks up with NULs.
+/// Writers pad chunks with NULs.
 BytesView withoutNULs(BytesView bytes)
 {
     return bytes.first(textOf(bytes).find_last_not_of('\0') + 1);
@@ -92,17 +92,17 @@ bool parse(BytesView bytes, TreeHandler& handler)
     return parser.parse();
 }
 
-/// Of several elements of a name each has its index, and in a list each always.
+/// Elements with siblings of the same name have an index, and elements in a list always do.
 bool hasIndex(const Element& element)
 {
     return (*element.likes > 1 || element.isInList) && !element.name.ends_with("_COUNT");
 }
 
-/// The root is the document, and no part of a path.
+/// The root stands for the document and is not part of a path.
 void addElements(const Elements& elements, MetaFields& fields)
 {
     std::string path;
-    std::vector<std::size_t> ends; // of the path of the element that is open at each depth
+    std::vector<std::size_t> ends; // end of the path of the open element at each depth
     for (const Element& element : elements) {
         ends.resize(element.depth + 1);
         path.resize(element.depth == 0 ? 0 : ends[element.depth - 1]);

@@ -53,8 +53,14 @@ std::int32_t DescribeCompressed(const platform::URL& url, BytesView start, Audio
 
 FourCC HostFileType(FourCC type)
 {
-    return type == fourCC("AIFC")   ? fourCC("AIFF")
-           : type == fourCC("m4af") ? fourCC("M4A ")
-           : type == fourCC("mp4f") ? fourCC("mpg4")
-                                    : type;
+    switch (type) {
+    case fourCC("AIFC"):
+        return fourCC("AIFF");
+    case fourCC("m4af"):
+        return fourCC("M4A ");
+    case fourCC("mp4f"):
+        return fourCC("mpg4");
+    default:
+        return type;
+    }
 }

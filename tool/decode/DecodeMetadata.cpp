@@ -133,10 +133,7 @@ public:
 
     KeptMetadata run()
     {
-        const Family target = fileType_ == kWAVE   ? Family::wave
-                              : fileType_ == kAIFF ? Family::aiff
-                              : fileType_ == kCaff ? Family::caf
-                                                   : Family::none;
+        const Family target = familyOfType(fileType_);
         if (target == Family::none || source_.family_ == Family::none)
             return {};
         if (target == source_.family_)
@@ -150,6 +147,20 @@ public:
     }
 
 private:
+    static Family familyOfType(FourCC fileType)
+    {
+        switch (fileType) {
+        case kWAVE:
+            return Family::wave;
+        case kAIFF:
+            return Family::aiff;
+        case kCaff:
+            return Family::caf;
+        default:
+            return Family::none;
+        }
+    }
+
     const SoundChange& change() const { return changed_.change; }
 
     void keep(FourCC sourceId, HeldChunk chunk)

@@ -122,6 +122,16 @@ bool isWave(const std::string& container)
     return container == "WAVE" || container == "RF64";
 }
 
+// Why an output cannot have tags; empty if it can.
+std::string obstacleIn(const std::string& container, bool isFile, bool isWhole)
+{
+    if (container != "AIFF" && container != "CAF" && !isWave(container))
+        return (container == "raw" ? "raw sound" : container) + " holds none";
+    if (!isFile)
+        return "they are put into files only";
+    return isWhole ? "" : "they are true of the whole file only";
+}
+
 } // namespace
 
 DecodeTags::DecodeTags(const std::string& path)
@@ -185,13 +195,11 @@ CarriedTags DecodeTags::carryTo(const std::string& output, const std::string& co
 {
     CarriedTags carried;
     leaveWhatMakesNoLoop(container);
-    const bool canHold = container == "AIFF" || container == "CAF" || isWave(container);
-    const std::string obstacle = !problem_.empty()    ? "they " + problem_
-                                 : source_ == nullptr ? ""
-                                 : !canHold ? fmt::format("{} holds none", container == "raw" ? "raw sound" : container)
-                                 : output.empty() ? "they are put into files only"
-                                 : !isWhole       ? "they are true of the whole file only"
-                                                  : "";
+    std::string obstacle;
+    if (!problem_.empty())
+        obstacle = "they " + problem_;
+    else if (source_ != nullptr)
+        obstacle = obstacleIn(container, !output.empty(), isWhole);
     if (obstacle.empty() && source_ != nullptr)
         for (const char* id : {"acid", "smpl", "INST"})
             std::erase(others_, id);

@@ -89,6 +89,24 @@ void drawSegments(Raster& raster, std::span<const Segment> segments, Point from,
         }
 }
 
+/// The widest that a character is in the fonts in use, in ems.
+float broadestEms(char32_t character)
+{
+    constexpr std::string_view kBroad = "mwMW@%", kNarrow = " .,:;'|!ijlI";
+    const auto isOf = [character](std::string_view set) {
+        return set.find(static_cast<char>(character)) != std::string_view::npos;
+    };
+    const auto glyph = labelGlyph(character);
+    if (!glyph)
+        return 0;
+    if (character < 0x80) {
+        if (isOf(kBroad))
+            return 1;
+        return isOf(kNarrow) ? 0.42F : 0.7F;
+    }
+    return character >= 0x1100 && glyph->width > 3.8F ? 1.1F : 0.9F;
+}
+
 } // namespace
 
 float labelWidth(std::string_view text, float size)
@@ -100,22 +118,9 @@ float labelWidth(std::string_view text, float size)
 float broadestWidth(std::string_view text, float size)
 {
     constexpr float kEm = 1 / 0.73F; // of the digit height
-    constexpr std::string_view kBroad = "mwMW@%", kNarrow = " .,:;'|!ijlI";
     float ems = 0;
-    for (std::string_view rest = text; !rest.empty();) {
-        const char32_t character = takeCharacter(rest);
-        const auto isOf = [character](std::string_view set) {
-            return character < 0x80 && set.find(static_cast<char>(character)) != std::string_view::npos;
-        };
-        const auto glyph = labelGlyph(character);
-        ems += !glyph                ? 0.0F
-               : isOf(kBroad)        ? 1.0F
-               : isOf(kNarrow)       ? 0.42F
-               : character < 0x80    ? 0.7F
-               : character < 0x1100  ? 0.9F
-               : glyph->width > 3.8F ? 1.1F
-                                     : 0.9F;
-    }
+    for (std::string_view rest = text; !rest.empty();)
+        ems += broadestEms(takeCharacter(rest));
     return std::max(labelWidth(text, size), ems * kEm * size);
 }
 

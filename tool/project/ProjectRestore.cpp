@@ -37,6 +37,16 @@ platform::URLRef backupNamed(const ProjectInformation& project, long alternative
     return url;
 }
 
+/// What a restore does first with an exchange that was cut short.
+const char* outcomeText(bool completes, bool wasComplete, bool isDryRun)
+{
+    if (completes)
+        return isDryRun ? "would complete it" : "completed it";
+    if (wasComplete)
+        return isDryRun ? "would leave it so" : "left it so";
+    return isDryRun ? "would undo it" : "undid it";
+}
+
 } // namespace
 
 void restoreBackup(const ProjectArguments& arguments, const OutputOptions& output)
@@ -60,12 +70,7 @@ void restoreBackup(const ProjectArguments& arguments, const OutputOptions& outpu
             sentence =
                 fmt::format("found an exchange with backup {} that was cut short{}; {}; ",
                             backupName(*interrupted, *project, alternative), wasComplete ? " when all was done" : "",
-                            arguments.edit.dryRun ? (completes     ? "would complete it"
-                                                     : wasComplete ? "would leave it so"
-                                                                   : "would undo it")
-                            : completes           ? "completed it"
-                            : wasComplete         ? "left it so"
-                                                  : "undid it");
+                            outcomeText(completes, wasComplete, arguments.edit.dryRun));
         sentence += fmt::format("alternative {} {} the data of backup {}, which {} what the alternative had",
                                 alternative, arguments.edit.dryRun ? "would have" : "has", backupName(backup),
                                 arguments.edit.dryRun ? "would have" : "has");

@@ -117,7 +117,7 @@ void InfoList::set(FourCC id, std::string_view text)
     if (found == items().end())
         return insert(index, id, textAndNUL(text));
     replaceBody(index, textAndNUL(text));
-    for (std::size_t other = items().size(); --other > index;)
+    for (std::size_t other = items().size() - 1; other > index; --other)
         if (items()[other].id == id)
             ListChunk::erase(other);
 }

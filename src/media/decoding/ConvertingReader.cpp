@@ -250,14 +250,33 @@ std::int32_t ConvertingReader::propertyInfo(FourCC id, std::uint32_t& size, bool
 {
     PacketTable table;
     isWritable = id == clientFormatProperty || id == clientLayoutProperty || id == checksumProperty;
-    size = id == checksumProperty                                   ? sizeof(Checksum)
-           : id == fileFormatProperty || id == clientFormatProperty ? sizeof(StreamDescription)
-           : id == clientLayoutProperty ? static_cast<std::uint32_t>(implementation_->layout.size())
-           : id == frameCountProperty || id == missingFramesProperty                   ? sizeof(std::uint64_t)
-           : id == audioFileProperty                                                   ? sizeof(AudioHandle*)
-           : id == packetTableProperty && implementation_->decoder->packetTable(table) ? sizeof table
-                                                                                       : 0;
-    return size > 0 || id == clientLayoutProperty ? kStatusOK : kPropertyNotSupported;
+    size = 0;
+    switch (id) {
+    case fileFormatProperty:
+    case clientFormatProperty:
+        size = sizeof(StreamDescription);
+        return kStatusOK;
+    case clientLayoutProperty:
+        size = static_cast<std::uint32_t>(implementation_->layout.size());
+        return kStatusOK;
+    case frameCountProperty:
+    case missingFramesProperty:
+        size = sizeof(std::uint64_t);
+        return kStatusOK;
+    case checksumProperty:
+        size = sizeof(Checksum);
+        return kStatusOK;
+    case audioFileProperty:
+        size = sizeof(AudioHandle*);
+        return kStatusOK;
+    case packetTableProperty:
+        if (!implementation_->decoder->packetTable(table))
+            return kPropertyNotSupported;
+        size = sizeof table;
+        return kStatusOK;
+    default:
+        return kPropertyNotSupported;
+    }
 }
 
 std::int32_t ConvertingReader::property(FourCC id, std::uint32_t& size, void* data)

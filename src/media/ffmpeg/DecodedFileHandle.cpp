@@ -2,6 +2,8 @@
 
 #include "platform/core/Status.h"
 
+#include <span>
+
 namespace platform::ffmpeg {
 
 DecodedFileHandle::DecodedFileHandle(FourCC type, const StreamDescription& format, std::uint64_t packetCount)
@@ -13,26 +15,36 @@ DecodedFileHandle::DecodedFileHandle(FourCC type, const StreamDescription& forma
     lend();
 }
 
+/// The bytes of a property; none if the file has no such property.
+BytesView DecodedFileHandle::valueOf(FourCC id) const
+{
+    const auto bytesOf = [](const auto& value) { return std::as_bytes(std::span(&value, 1)); };
+    switch (id) {
+    case AudioFile::fileTypeProperty:
+        return bytesOf(type_);
+    case AudioFile::dataFormatProperty:
+        return bytesOf(format_);
+    case AudioFile::packetCountProperty:
+        return packetCount_ != unknownCount ? bytesOf(packetCount_) : BytesView();
+    default:
+        return {};
+    }
+}
+
 std::int32_t DecodedFileHandle::propertyInfo(FourCC id, std::uint32_t& size, bool& isWritable)
 {
     isWritable = false;
-    size = id == AudioFile::fileTypeProperty                                      ? sizeof type_
-           : id == AudioFile::dataFormatProperty                                  ? sizeof format_
-           : id == AudioFile::packetCountProperty && packetCount_ != unknownCount ? sizeof packetCount_
-                                                                                  : 0;
-    return size > 0 ? kStatusOK : AudioFile::kUnsupportedProperty;
+    const BytesView value = valueOf(id);
+    size = static_cast<std::uint32_t>(value.size());
+    return value.empty() ? AudioFile::kUnsupportedProperty : kStatusOK;
 }
 
 std::int32_t DecodedFileHandle::property(FourCC id, std::uint32_t& size, void* data)
 {
-    std::uint32_t have = 0;
-    bool isWritable;
-    if (const std::int32_t status = propertyInfo(id, have, isWritable); status != kStatusOK)
-        return status;
-    const void* const value = id == AudioFile::fileTypeProperty     ? static_cast<const void*>(&type_)
-                              : id == AudioFile::dataFormatProperty ? static_cast<const void*>(&format_)
-                                                                    : &packetCount_;
-    return give(value, have, size, data);
+    const BytesView value = valueOf(id);
+    if (value.empty())
+        return AudioFile::kUnsupportedProperty;
+    return give(value.data(), static_cast<std::uint32_t>(value.size()), size, data);
 }
 
 std::int32_t DecodedFileHandle::setProperty(FourCC, std::uint32_t, const void*)

@@ -18,6 +18,8 @@ public:
     std::int32_t setProperty(FourCC id, std::uint32_t size, const void* data) override;
 
 private:
+    BytesView valueOf(FourCC id) const;
+
     FourCC type_;
     StreamDescription format_;
     std::uint64_t packetCount_;

@@ -116,7 +116,7 @@ std::int32_t FileDecoder::begin()
                          endsWithTime_ ? Codec::Padding::kept : Codec::Padding::dropped, status);
     expected_ = sent_ = 0;
     isNumbered_ = true;
-    hasGivenUp_ = false;
+    search_ = {};
     pending_.reset();
     return status;
 }
@@ -365,7 +365,8 @@ bool FileDecoder::land(std::uint64_t number, std::uint64_t back, std::uint64_t n
     if (corrections_)
         corrections_->seek(timeOf(number - back));
     codec_->flush();
-    isNumbered_ = hasGivenUp_ = false;
+    isNumbered_ = false;
+    search_ = {};
     page_ = -1;
     Span span;
     if (decodeNext(span) != kStatusOK || span.start == kNever || span.start > number - needed)
@@ -385,9 +386,8 @@ bool FileDecoder::landAtCheckpoint(std::uint64_t number)
     if (!demuxer_.seek(checkpoints_[before - 2].time))
         return false;
     codec_->flush();
-    isNumbered_ = hasGivenUp_ = false;
-    met_ = 0;
-    searchEnd_ = checkpoints_[before - 1].time;
+    isNumbered_ = false;
+    search_ = {.end = checkpoints_[before - 1].time};
     Span span;
     const bool isFound = decodeNext(span) == kStatusOK && span.start <= number;
     if (isFound)
@@ -415,39 +415,45 @@ bool FileDecoder::tellsNumber(const AVFrame& frame) const
     return !isPaged_ || frame.pkt_duration == frame.nb_samples;
 }
 
+/// Gives the frame that was decoded its numbers. False if nobody knows them, and if they lie outside the sound: then
+/// the frame is dropped.
+bool FileDecoder::numberFrame(const AVFrame& frame, Span& span)
+{
+    std::uint64_t number = expected_;
+    if (tellsNumber(frame)) {
+        if (numbers_ == Numbers::byTime && base_ == AV_NOPTS_VALUE)
+            base_ = startOf(frame);
+        const std::int64_t origin = numbers_ == Numbers::byTime ? base_ : 0;
+        number = static_cast<std::uint64_t>(frame.pts) - static_cast<std::uint64_t>(origin);
+        if (frame.pts < origin || number >= std::min(limit_, kMostFrames))
+            return false;
+        isNumbered_ = true;
+    }
+    if (!isNumbered_ || frame.nb_samples <= 0)
+        return false;
+    length_ = static_cast<std::uint64_t>(frame.nb_samples);
+    expected_ = number + length_;
+    span = {number, expected_};
+    return true;
+}
+
 std::int32_t FileDecoder::decodeNext(Span& span)
 {
     for (;;) {
-        switch (codec_->receive()) {
-        case Codec::Result::frame: {
-            const AVFrame& frame = decoded();
-            const bool isTold = tellsNumber(frame);
-            if (isTold && numbers_ == Numbers::byTime && base_ == AV_NOPTS_VALUE)
-                base_ = startOf(frame);
-            const std::int64_t origin = numbers_ == Numbers::byTime ? base_ : 0;
-            const std::uint64_t told = static_cast<std::uint64_t>(frame.pts) - static_cast<std::uint64_t>(origin);
-            if (isTold && (frame.pts < origin || told >= std::min(limit_, kMostFrames)))
-                break;
-            isNumbered_ = isNumbered_ || isTold;
-            if (!isNumbered_ || frame.nb_samples <= 0)
-                break;
-            span.start = isTold ? told : expected_;
-            length_ = static_cast<std::uint64_t>(frame.nb_samples);
-            span.end = expected_ = span.start + length_;
+        const Codec::Result result = codec_->receive();
+        if (result == Codec::Result::frame && numberFrame(decoded(), span))
             return kStatusOK;
-        }
-        case Codec::Result::needsPacket:
+        if (result == Codec::Result::failed)
+            passOver();
+        bool isOver = result == Codec::Result::end;
+        if (result == Codec::Result::needsPacket) {
             if (const std::int32_t status = sendPacket(); status != kStatusOK)
                 return status;
-            if (!hasGivenUp_)
-                break;
-            [[fallthrough]];
-        case Codec::Result::end:
+            isOver = search_.hasFailed;
+        }
+        if (isOver) {
             span = {kNever, kNever};
             return kStatusOK;
-        case Codec::Result::failed:
-            passOver();
-            break;
         }
     }
 }
@@ -466,7 +472,7 @@ std::int32_t FileDecoder::sendPacket()
         return status != kStatusOK || codec_->send(nullptr) != Codec::Sent::outOfMemory ? status : kStatusOutOfMemory;
     if (corrections_)
         corrections_->attachTo(*packet_);
-    numberPacket();
+    numberPacket(*packet_);
     ++sent_;
     const Codec::Sent sent = codec_->send(packet_.get());
     if (sent == Codec::Sent::failed)
@@ -475,44 +481,57 @@ std::int32_t FileDecoder::sendPacket()
     return sent != Codec::Sent::outOfMemory ? kStatusOK : kStatusOutOfMemory;
 }
 
-/// Numbers the packet's frames, as far as the packet tells.
-void FileDecoder::numberPacket()
+/// Puts into `pts` the number of the packet's first frame, as far as the packet tells.
+void FileDecoder::numberPacket(AVPacket& packet)
 {
-    AVPacket& packet = *packet_;
     switch (numbers_) {
     case Numbers::byTime:
-        // In Ogg, the times on the page that a seek leads to are derived from its end, which may be cut on the last
-        // page; those on the next page follow from the page before.
-        if (isPaged_ && !isNumbered_ && (page_ < 0 || packet.pos == page_)) {
-            page_ = packet.pos;
-            packet.pts = AV_NOPTS_VALUE;
-        }
-        break;
-    case Numbers::byPosition: {
-        if (base_ == AV_NOPTS_VALUE)
-            base_ = packet.pos;
-        const int block = demuxer_.stream().codecpar->block_align;
-        const bool isKnown = packet.pos >= base_ && (packet.pos - base_) % block == 0;
-        packet.pts =
-            isKnown ? (packet.pos - base_) / block * static_cast<std::int64_t>(framesPerBlock_) : AV_NOPTS_VALUE;
-        break;
+        return numberByTime(packet);
+    case Numbers::byPosition:
+        return numberByPosition(packet);
+    case Numbers::byCount:
+        return meetCheckpoint(packet);
     }
-    case Numbers::byCount: {
-        const std::int64_t time = packet.pts;
-        packet.pts = AV_NOPTS_VALUE;
-        if (time == AV_NOPTS_VALUE)
-            break;
-        if (isCounting_)
-            checkpoints_.offer({time, packet.pos, expected_});
-        const Checkpoint* met = isNumbered_ ? nullptr : checkpoints_.find(time, packet.pos);
-        if (met != nullptr && ++met_ == 2) {
-            expected_ = met->frame;
-            isNumbered_ = true;
-        }
-        hasGivenUp_ = !isNumbered_ && time > searchEnd_;
-        break;
+}
+
+/// Times count frames as they stand, except in Ogg on the page that a seek leads to: there they are derived from the
+/// page's end, which may be cut on the last page. Times on the next page follow from the page before.
+void FileDecoder::numberByTime(AVPacket& packet)
+{
+    const bool isOnFirstPage = page_ < 0 || packet.pos == page_;
+    if (!isPaged_ || isNumbered_ || !isOnFirstPage)
+        return;
+    page_ = packet.pos;
+    packet.pts = AV_NOPTS_VALUE;
+}
+
+void FileDecoder::numberByPosition(AVPacket& packet)
+{
+    if (base_ == AV_NOPTS_VALUE)
+        base_ = packet.pos;
+    const int block = demuxer_.stream().codecpar->block_align;
+    const std::int64_t distance = packet.pos - base_;
+    const bool isKnown = packet.pos >= base_ && distance % block == 0;
+    packet.pts = isKnown ? distance / block * static_cast<std::int64_t>(framesPerBlock_) : AV_NOPTS_VALUE;
+}
+
+/// Counted frames have no numbers in their packets. Keeps a checkpoint while everything is counted from the start;
+/// after a seek, numbers begin at the second checkpoint that the packets meet.
+void FileDecoder::meetCheckpoint(AVPacket& packet)
+{
+    const std::int64_t time = std::exchange(packet.pts, AV_NOPTS_VALUE);
+    if (time == AV_NOPTS_VALUE)
+        return;
+    if (isCounting_)
+        checkpoints_.offer({time, packet.pos, expected_});
+    if (!isNumbered_) {
+        const Checkpoint* const checkpoint = checkpoints_.find(time, packet.pos);
+        search_.met += checkpoint != nullptr ? 1 : 0;
+        isNumbered_ = checkpoint != nullptr && search_.met == 2;
+        if (isNumbered_)
+            expected_ = checkpoint->frame;
     }
-    }
+    search_.hasFailed = !isNumbered_ && time > search_.end;
 }
 
 std::unique_ptr<AudioDecoder> openFile(const char* path, std::int32_t& status)

@@ -26,6 +26,14 @@ private:
         byCount,    // all frames from the start were decoded
     };
 
+    /// The search for two checkpoints after a seek: at the first the decoder starts to build its state, at the second
+    /// frames get their numbers.
+    struct CheckpointSearch {
+        std::size_t met = 0;
+        std::int64_t end = 0; // time by which both must have been met
+        bool hasFailed = false;
+    };
+
     FileDecoder(Demuxer demuxer, std::unique_ptr<CorrectionFile> corrections);
     std::int32_t begin();
     std::int32_t describeAsDecoded();
@@ -44,7 +52,11 @@ private:
     std::int32_t decodeNext(Span& span);
     bool tellsNumber(const AVFrame& frame) const;
     std::int32_t sendPacket();
-    void numberPacket();
+    bool numberFrame(const AVFrame& frame, Span& span);
+    void numberPacket(AVPacket& packet);
+    void numberByTime(AVPacket& packet);
+    void numberByPosition(AVPacket& packet);
+    void meetCheckpoint(AVPacket& packet);
     void passOver();
 
     std::int32_t next(Span& span) override;
@@ -73,9 +85,7 @@ private:
     std::optional<Span> pending_;      // decoded already, returned next
     Checkpoints checkpoints_;
     bool isCounting_ = false;
-    std::size_t met_ = 0;        // checkpoints met since the last seek
-    std::int64_t searchEnd_ = 0; // time by which two must have been met
-    bool hasGivenUp_ = false;    // they were not
+    CheckpointSearch search_;
 };
 
 /// As DecoderModule::openFile.

@@ -72,13 +72,69 @@ Bytes lastBytes(HeaderWindow& file, std::uint32_t largestFrame)
     return bytes;
 }
 
+// Codes of block sizes and sample rates in a frame's header (RFC 9639, 9.1.1 and 9.1.2). Some refer to a number of one
+// or two bytes, which stands after the frame's own number.
+
+std::size_t bytesOfFLACBlockSize(std::uint32_t code)
+{
+    switch (code) {
+    case 6:
+        return 1;
+    case 7:
+        return 2;
+    default:
+        return 0;
+    }
+}
+
+std::uint32_t flacBlockSize(std::uint32_t code, const std::byte* number)
+{
+    switch (code) {
+    case 1:
+        return 192;
+    case 6:
+        return std::to_integer<std::uint32_t>(*number) + 1;
+    case 7:
+        return loadBE<std::uint16_t>(number) + 1U;
+    default:
+        return code < 6 ? 144U << code : 1U << code;
+    }
+}
+
+std::size_t bytesOfFLACRate(std::uint32_t code)
+{
+    switch (code) {
+    case 12:
+        return 1;
+    case 13:
+    case 14:
+        return 2;
+    default:
+        return 0;
+    }
+}
+
+std::uint32_t flacRate(std::uint32_t code, const std::byte* number)
+{
+    constexpr std::array<std::uint32_t, 12> rates{0,     88200, 176400, 192000, 8000,  16000,
+                                                  22050, 24000, 32000,  44100,  48000, 96000};
+    switch (code) {
+    case 12:
+        return std::to_integer<std::uint32_t>(*number) * 1000;
+    case 13:
+        return loadBE<std::uint16_t>(number);
+    case 14:
+        return loadBE<std::uint16_t>(number) * 10U;
+    default:
+        return rates[code];
+    }
+}
+
 } // namespace
 
 std::optional<FLACFrame> parseFLACFrame(BytesView bytes, std::uint32_t blockSize)
 {
     constexpr std::size_t kMostHeader = 16, kFixedSize = 4;
-    constexpr std::array<std::uint32_t, 12> rates{0,     88200, 176400, 192000, 8000,  16000,
-                                                  22050, 24000, 32000,  44100,  48000, 96000};
     constexpr std::array<std::uint32_t, 8> bits{0, 8, 12, 0, 16, 20, 24, 32};
     bytes = bytes.first(std::min(bytes.size(), kMostHeader));
     if (bytes.size() < kFixedSize + 2)
@@ -97,28 +153,20 @@ std::optional<FLACFrame> parseFLACFrame(BytesView bytes, std::uint32_t blockSize
     for (; at < kFixedSize + length; ++at)
         number = number << 6 | (std::to_integer<std::uint64_t>(bytes[at]) & 0x3F);
     const std::uint32_t code = fixed >> 12 & 15;
-    const std::size_t sizeBytes = code == 6 ? 1 : code == 7 ? 2 : 0;
+    const std::size_t sizeBytes = bytesOfFLACBlockSize(code);
     const std::uint32_t rate = fixed >> 8 & 15;
-    const std::size_t rateBytes = rate == 12 ? 1 : rate == 13 || rate == 14 ? 2 : 0;
+    const std::size_t rateBytes = bytesOfFLACRate(rate);
     if (code == 0 || rate == 15 || bytes.size() < at + sizeBytes + rateBytes + 1)
         return {};
-    const std::uint32_t size = code == 1   ? 192
-                               : code <= 5 ? 144U << code
-                               : code == 6 ? std::to_integer<std::uint32_t>(bytes[at]) + 1
-                               : code == 7 ? loadBE<std::uint16_t>(bytes.data() + at) + 1U
-                                           : 1U << code;
+    FLACFrame frame;
+    frame.samples = flacBlockSize(code, bytes.data() + at);
     at += sizeBytes;
-    const std::uint32_t written = rateBytes == 1   ? std::to_integer<std::uint32_t>(bytes[at])
-                                  : rateBytes == 2 ? loadBE<std::uint16_t>(bytes.data() + at)
-                                                   : 0U;
+    frame.sampleRate = flacRate(rate, bytes.data() + at);
     at += rateBytes;
     if (highFirstCRC<8, 0x07>(bytes.first(at)) != std::to_integer<std::uint32_t>(bytes[at]))
         return {};
     const bool countsSamples = (fixed >> 16 & 1) != 0;
-    FLACFrame frame;
     frame.first = countsSamples ? number : number * blockSize;
-    frame.samples = size;
-    frame.sampleRate = rate < rates.size() ? rates[rate] : written * (rate == 12 ? 1000 : rate == 14 ? 10 : 1);
     frame.channels = (fixed >> 4 & 8) != 0 ? 2 : (fixed >> 4 & 7) + 1; // a stereo mode, or independent channels
     frame.bits = bits[fixed >> 1 & 7];
     return frame;

@@ -11,6 +11,17 @@ namespace platform {
 
 namespace {
 
+/// A packet's size in a box "stz2", at the start of `bytes`; sizes of 4 bits stand two to a byte, the first one higher.
+std::uint32_t compactSize(BytesView bytes, unsigned bits, bool isHighHalf)
+{
+    if (bits == 16)
+        return loadBE<std::uint16_t>(bytes.data());
+    const auto byte = std::to_integer<std::uint32_t>(bytes[0]);
+    if (bits == 8)
+        return byte;
+    return isHighHalf ? byte >> 4 : byte & 15;
+}
+
 /// A box of fixed-size entries after a count.
 class Entries {
 public:
@@ -113,11 +124,7 @@ private:
             const BytesView bytes = file_.at(box.body + 12 + i * bits / 8, bits == 16 ? 2 : 1);
             if (bytes.empty() || bytes.size() < bits / 8)
                 return kStatusIOError;
-            const auto byte = std::to_integer<unsigned>(bytes[0]);
-            table_.packets.append(bits == 16   ? loadBE<std::uint16_t>(bytes.data())
-                                  : bits == 8  ? byte
-                                  : i % 2 == 0 ? byte >> 4
-                                               : byte & 15);
+            table_.packets.append(compactSize(bytes, bits, i % 2 == 0));
         }
         return kStatusOK;
     }

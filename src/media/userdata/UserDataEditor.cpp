@@ -133,7 +133,9 @@ std::optional<std::int32_t> UserDataEditor::placeInFrontOf(std::size_t hidden, c
     const std::uint64_t hiddenEnd = hidden < layout_.chunks.size() ? runAround(hidden).end : layout_.end;
     Content backwards(content.rbegin(), content.rend());
     std::uint64_t copied = 0;
-    for (std::size_t i = hidden; i-- > 1;) {
+    std::size_t i = hidden;
+    while (i > 1) {
+        --i;
         if (isFiller(i)) {
             const Run filler = runAround(i);
             if (const auto status = fillFront(filler, hiddenEnd, {backwards.rbegin(), backwards.rend()}))
@@ -196,6 +198,19 @@ std::optional<std::int32_t> UserDataEditor::placeAtEnd(std::size_t hiddenFrom, c
         return status;
     const std::size_t last = layout_.chunks.size() - 1;
     return fillBehind(position, run(last, last + 1), content);
+}
+
+/// Writes ahead of the chunk `next`, at place `first` or later: into filler there, or else after the last chunk, where
+/// `next` and all that follows it move along.
+std::optional<std::int32_t> UserDataEditor::placeAheadOf(std::size_t next, std::size_t first, const Content& content)
+{
+    if (const auto status = placeBetween(first, next, content))
+        return status;
+    auto moved = everythingFrom(next);
+    if (!moved)
+        return std::nullopt;
+    moved->insert(moved->begin(), content.begin(), content.end());
+    return placeAtEnd(next, *moved);
 }
 
 // How content is written.
@@ -295,22 +310,16 @@ std::int32_t UserDataEditor::replaceByTwoSteps(std::size_t chunk, const Piece& p
 {
     Content content{piece};
     std::vector<std::size_t> old{chunk};
+    std::size_t next = nextOfType(chunk + 1, piece.id);
     std::optional<std::int32_t> status;
-    while (!status) {
-        const std::size_t next = nextOfType(old.back() + 1, piece.id);
-        if (next == layout_.chunks.size()) {
-            status = appendContent(content);
-        } else if (status = placeBetween(old.back() + 1, next, content); !status) {
-            if (auto moved = everythingFrom(next)) {
-                moved->insert(moved->begin(), content.begin(), content.end());
-                status = placeAtEnd(next, *moved);
-            }
-            if (!status) {
-                content.push_back(pieceOf(next));
-                old.push_back(next);
-            }
-        }
+    for (; next < layout_.chunks.size(); next = nextOfType(next + 1, piece.id)) {
+        if (status = placeAheadOf(next, old.back() + 1, content); status)
+            break;
+        content.push_back(pieceOf(next));
+        old.push_back(next);
     }
+    if (!status)
+        status = appendContent(content);
     if (*status != kStatusOK)
         return *status;
 
@@ -328,16 +337,18 @@ std::int32_t UserDataEditor::hideOld(const std::vector<std::size_t>& old, FourCC
     std::int32_t status = file_.flush();
     while (status == kStatusOK && left > 0) {
         status = hide(old[left - 1]);
-        left -= status == kStatusOK ? 1 : 0;
+        if (status == kStatusOK)
+            --left;
         if (const std::int32_t scanned = rescan(); scanned != kStatusOK)
             return scanned;
     }
     // Removes the new chunks whose old ones are still there.
-    const std::size_t last = left > 0 ? old[left - 1] : 0;
-    for (std::size_t next; left > 0; --left)
-        if (next = nextOfType(last + 1, id);
-            next == layout_.chunks.size() || hide(next) != kStatusOK || rescan() != kStatusOK)
+    const std::size_t firstNew = left > 0 ? old[left - 1] + 1 : 0;
+    for (; left > 0; --left) {
+        const std::size_t added = nextOfType(firstNew, id);
+        if (added == layout_.chunks.size() || hide(added) != kStatusOK || rescan() != kStatusOK)
             break;
+    }
     return status;
 }
 

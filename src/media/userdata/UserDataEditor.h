@@ -58,6 +58,7 @@ private:
     std::optional<std::int32_t> placeBehind(std::size_t hidden, const Piece& piece);
     std::optional<std::int32_t> placeBetween(std::size_t first, std::size_t past, const Content& content);
     std::optional<std::int32_t> placeAtEnd(std::size_t hiddenFrom, const Content& content);
+    std::optional<std::int32_t> placeAheadOf(std::size_t next, std::size_t first, const Content& content);
     std::optional<std::int32_t> fillFront(const Run& filler, std::uint64_t hiddenEnd, const Content& content);
     std::optional<std::int32_t> fillBehind(std::uint64_t hiddenFrom, const Run& filler, const Content& content);
 

@@ -178,10 +178,11 @@ CoordinationDirectory::CoordinationDirectory(const std::string& path)
     folder_ = Descriptor([&] { return ::open(path.c_str(), O_RDONLY | O_DIRECTORY | O_NOFOLLOW | O_CLOEXEC); });
     if (!folder_) {
         const int reason = errno; // the error does not say whose folder it is
-        fail(reason, ::lstat(path.c_str(), &status) != 0 ? what
-                     : status.st_uid != ::geteuid()      ? what + " belongs to " + ownerText(status.st_uid)
-                     : S_ISLNK(status.st_mode)           ? what + " is a link"
-                                                         : what);
+        if (::lstat(path.c_str(), &status) != 0)
+            fail(reason, what);
+        if (status.st_uid != ::geteuid())
+            fail(reason, what + " belongs to " + ownerText(status.st_uid));
+        fail(reason, S_ISLNK(status.st_mode) ? what + " is a link" : what);
     }
     if (made)
         ::fchmod(folder_.get(), kOwnerOnly); // whatever the process's mask is

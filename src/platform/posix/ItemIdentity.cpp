@@ -14,10 +14,16 @@ namespace {
 
 FileKind kindOf(unsigned mode)
 {
-    return S_ISREG(mode)   ? FileKind::file
-           : S_ISDIR(mode) ? FileKind::directory
-           : S_ISLNK(mode) ? FileKind::symbolicLink
-                           : FileKind::other;
+    switch (mode & S_IFMT) {
+    case S_IFREG:
+        return FileKind::file;
+    case S_IFDIR:
+        return FileKind::directory;
+    case S_IFLNK:
+        return FileKind::symbolicLink;
+    default:
+        return FileKind::other;
+    }
 }
 
 void readHandle(const char* path, ItemIdentity& identity)

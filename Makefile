@@ -3,7 +3,7 @@ export JOBS ?= $(shell nproc)
 PREFIX ?= /usr/local
 FUZZ_SECONDS ?= 60
 
-.PHONY: all run test asan tsan clang test-arm64 test-s390x check stress bench fuzz install package clean
+.PHONY: all run test asan tsan clang test-arm64 test-s390x check stress bench fuzz install package docs clean
 
 all:
 	@scripts/build release
@@ -43,6 +43,10 @@ bench:
 fuzz:
 	@scripts/build fuzz
 	@scripts/fuzz build/fuzz/fuzz $(FUZZ_SECONDS)
+
+# The public headers and the guide as pages, build/docs/html/index.html.
+docs:
+	@scripts/docs
 
 install: all
 	cmake --install build/release --prefix $(PREFIX)

@@ -1,37 +1,16 @@
 """What README.md and the man page tell people to type, typed: every example works as it stands, and shows what they say."""
-import difflib
-import fcntl
-import os
 import pathlib
 import re
 import shutil
-import struct
 import subprocess
-import termios
 import unittest
 
-from command import KTFILES, MEDIA, CommandTest, needs_decoders
+from command import needs_decoders
 from picture import decoded_png
+from typed import TypedTest, blocks, shown
 
 ROOT = pathlib.Path(__file__).resolve().parents[2]
 README = (ROOT / "README.md").read_text(encoding="utf-8")
-OMITTED = "⋮"
-
-
-def blocks(language):
-    """The fenced blocks of the README in a language, as lists of lines."""
-    return [block.splitlines() for block in re.findall(rf"^```{language}\n(.*?)^```", README, re.S | re.M)]
-
-
-def shown():
-    """(command, lines that the README shows below it) of all that it has a console do."""
-    steps = []
-    for line in (line for block in blocks("console") for line in block):
-        if line.startswith("$ "):
-            steps.append((line[2:], []))
-        else:
-            steps[-1][1].append(line)
-    return [(command, lines[:-1] if lines and not lines[-1] else lines) for command, lines in steps]
 
 
 def examples():
@@ -41,54 +20,19 @@ def examples():
     return [line.strip() for line in section.splitlines() if line.startswith(" " * 9)]
 
 
-def without_what_varies(line):
-    """Dates and process ids."""
-    return re.sub(r" +\d{2,7}\b(?=  ktfiles)", " PID", re.sub(r"\b\d{4}-\d\d-\d\dT\d\d:\d\d:\d\dZ", "DATE", line))
-
-
-class DocumentsTest(CommandTest):
-    def setUp(self):
-        super().setUp()
-        shutil.copytree(MEDIA, self.folder, dirs_exist_ok=True)
-        null_device = self.folder.with_suffix(".asound")  # sound goes nowhere, with or without a device
-        null_device.write_text("pcm.!default { type null }\nctl.!default { type null }\n", encoding="utf-8")
-        self.addCleanup(null_device.unlink)
-        self.environment = {**os.environ, "PATH": f"{os.path.dirname(KTFILES)}:{os.environ['PATH']}", "NO_COLOR": "1",
-                            "TERM": "xterm", "LC_ALL": "C.UTF-8", "ALSA_CONFIG_PATH": str(null_device)}
-
-    def typed(self, command, columns=100):
-        """What a terminal shows after a command."""
-        ours, theirs = os.openpty()
-        fcntl.ioctl(theirs, termios.TIOCSWINSZ, struct.pack("HHHH", 40, columns, 0, 0))
-        with subprocess.Popen(["bash", "-c", command], stdin=theirs, stdout=theirs, stderr=theirs, cwd=self.folder,
-                              env=self.environment, start_new_session=True):
-            os.close(theirs)
-            text = b""
-            try:
-                while piece := os.read(ours, 65536):
-                    text += piece
-            except OSError:  # EIO: the other side is gone
-                pass
-        os.close(ours)
-        return text.decode().replace("\r\n", "\n").splitlines()
-
+class DocumentsTest(TypedTest):
     @needs_decoders
     def test_the_readme_shows_what_its_commands_show(self):
         for_each_user = re.findall(r"^\| \*\*.*\| `(ktfiles [^`]+)` \|$", README, re.M)
         self.assertEqual(len(for_each_user), 3)
         for command in for_each_user:
             self.assert_works(command)
-        steps = shown()
-        self.assertGreater(len(steps), 10)
-        for command, expected in steps:
-            pattern = "".join(r"(?:.*\n)*" if line.strip() == OMITTED else re.escape(without_what_varies(line)) + "\n" for line in expected)
-            found = self.typed(command)
-            if not re.fullmatch(pattern, "".join(without_what_varies(line) + "\n" for line in found)):
-                self.fail("\n".join(difflib.unified_diff(expected, found, "README.md: " + command, "now", lineterm="")))
+        self.assertGreater(len(shown(README)), 10)
+        self.assert_shows("README.md", README)
 
     def test_the_picture_of_the_readme_is_what_is_drawn(self):
         name = re.search(r"!\[.*\]\((docs/.*\.png)\)", README).group(1)
-        drawing = next(command for command, _ in shown() if "--png" in command)
+        drawing = next(command for command, _ in shown(README) if "--png" in command)
         self.typed(drawing)
         drawn = self.folder / re.search(r"--png (\S+)", drawing).group(1)
         self.assertTrue(decoded_png(drawn.read_bytes()) == decoded_png((ROOT / name).read_bytes()), f"{drawing} draws another")
@@ -128,7 +72,7 @@ class DocumentsTest(CommandTest):
 
     def test_the_code_in_the_readme_compiles(self):
         for language, compiler in (("cpp", ["g++", "-std=c++20", "-xc++"]), ("c", ["gcc", "-std=c99", "-pedantic", "-xc"])):
-            for lines in blocks(language):
+            for lines in blocks(README, language):
                 includes = [line for line in lines if line.startswith("#include")]
                 program = "\n".join([*includes, "int main(void) {", *(line for line in lines if line not in includes), "}"])
                 subprocess.run([*compiler, "-fsyntax-only", "-Wall", "-Wextra", "-Werror", "-I", ROOT / "src", "-"],
@@ -145,7 +89,7 @@ class DocumentsTest(CommandTest):
     def test_examples_of_the_man_page_work_when_they_are_copied(self):
         synopsis = (ROOT / "tool/ktfiles.1").read_text(encoding="utf-8").split(".Sh DESCRIPTION")[0]
         commands = examples()[2:]  # behind those that copy the installed files
-        for command, _ in shown():  # whoever went through the README first is as well served
+        for command, _ in shown(README):  # whoever went through the README first is as well served
             self.typed(command)
         for verb in set(re.findall(r"^\.Cm (.+)$", synopsis, re.M)):
             self.assertTrue([line for line in commands if f"ktfiles {verb}" in line], f"no example of {verb}")

@@ -1,4 +1,4 @@
-// What a file says about itself, field by field, each told where it stands.
+// What a file says about itself, field by field, each with its place.
 #pragma once
 
 #include "platform/core/Bytes.h"
@@ -11,36 +11,39 @@
 
 /// One chunk, as far as it is held.
 struct MetaChunk {
-    FourCC id = 0;
-    std::int64_t offset = 0; // of the header, in the file
+    FourCC id = 0;           // of the chunk
+    std::int64_t offset = 0; // of the header, from the start of the file
     std::int64_t size = 0;   // as stated
-    Bytes body;              // what is there; of what is too long to be held the beginning
+    Bytes body;              // all of it or, of a chunk too long to be held, its beginning
     bool isHeld = true;      // false where `body` is such a beginning
 };
 
+/// One field of a file.
 struct MetaField {
+    /// What a field holds.
     using Value = std::variant<std::string, std::int64_t, std::uint64_t, double>;
 
     std::string group;              // "bext": what the option --only asks for
-    std::string place;              // "bext", of a second chunk "bext[1]"
+    std::string place;              // "bext"; of a second such chunk "bext[1]"
     std::string name;               // within the place: "description"; empty where the chunk is the field
     Value value;                    // texts in UTF-8
-    std::string words;              // what the value or its id stands for: "Artist", "LUFS"
-    std::optional<double> seconds;  // what a number of frames takes
-    const char* encoding = nullptr; // of a text that is not UTF-8, its IANA name
+    std::string words;              // the meaning of the value or its id: "Artist", "LUFS"
+    std::optional<double> seconds;  // the duration of a number of frames
+    const char* encoding = nullptr; // of a text that was not UTF-8, the IANA name; else null
     std::optional<std::uint64_t>
-        byteSize; // of bytes: `value` is the hexadecimal of the first, `ascii` the same as text
-    std::string ascii;
-    FourCC chunk = 0;
-    std::int64_t offset = 0;
+        byteSize;            // of bytes: `value` is the hexadecimal of the first, `ascii` the same as text
+    std::string ascii;       // of bytes: the first ones as text
+    FourCC chunk = 0;        // the id of its chunk
+    std::int64_t offset = 0; // of the chunk's header, from the start of the file
 
-    /// "bext.description", "cue[3].label".
+    /// The place and the name: "bext.description", "cue[3].label".
     std::string fullName() const
     {
         std::string text;
         appendFullName(text);
         return text;
     }
+    /// Appends fullName() to a text.
     void appendFullName(std::string& text) const
     {
         text += place;

@@ -13,19 +13,19 @@
 
 /// All chunks of a file that may be metadata, in their order.
 struct KT_EXPORT MetaSource {
-    std::vector<MetaChunk> chunks;
+    std::vector<MetaChunk> chunks;        // in the order of the file
     std::endian order = std::endian::big; // of the numbers in them
 
-    /// The first chunk of an id that is held; null when there is none.
+    /// The first held chunk of an id; null when there is none.
     const MetaChunk* find(FourCC id) const;
 
-    // What chunks refer to in others, read once however many ask:
+    // What chunks refer to in others, read once however often it is asked for:
 
-    /// The index that a point has in "cue ", by its id.
+    /// The index of each point in "cue ", by its id.
     const std::map<std::uint32_t, std::size_t>& cueIndices() const;
-    /// In frames, of the markers of "MARK", by their ids.
+    /// The positions in frames of the markers of "MARK", by their ids.
     const std::map<std::int16_t, std::uint32_t>& markerPositions() const;
-    /// Of the texts of "strg", by their ids; not of more bytes than that chunk has, since they may overlap.
+    /// The texts of "strg", by their ids; in all no more bytes than the chunk has, since texts may overlap.
     const std::map<std::uint32_t, std::string>& texts() const;
 
 private:

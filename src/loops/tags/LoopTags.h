@@ -1,5 +1,5 @@
-// The loop tags of one file: what its loop chunks say, if it is AIFF or CAF, and what the chunks of samplers say in
-// WAVE and AIFF. LoopTagsEdit.h changes them.
+// The loop tags of one file: what its loop chunks say in AIFF and CAF, and what the chunks of samplers say in WAVE
+// and AIFF. LoopTagsEdit.h changes them.
 #pragma once
 
 #include "loops/SamplerTags.h"
@@ -14,53 +14,54 @@
 #include <string_view>
 #include <vector>
 
-/// Plain values; nothing of the file stays open.
+/// All tags as plain values; nothing of the file stays open.
 struct KT_EXPORT LoopTags {
-    /// A chunk that is carried without being interpreted. `size` is that of its body, without a UUID.
+    /// A chunk that is carried uninterpreted.
     struct Chunk {
-        std::string id; // the AIFF id in either kind of file; "silence" for the chunk that has none
-        std::uint32_t size = 0;
+        std::string id;         // the AIFF id in both kinds of file; "silence" for the chunk without one
+        std::uint32_t size = 0; // of its body, without a UUID, in bytes
     };
 
-    FourCC fileType = 0; // "AIFF", "AIFC", "caff", "WAVE", "RIFX" or "W64f"
-    double sampleRate = 0;
-    std::uint64_t frames = 0;
-    platform::Dictionary combined; // under the VireoLoopCombinedTagsChunkData keys
-    platform::Dictionary info;     // under the VireoLoopFileInfoChunkData keys
-    std::vector<VireoLoopTransient> transients;
-    std::vector<Chunk> chunks;
-    bool hasLoopChunks = false; // of this library's kind
-    SamplerTags sampler;        // what it says stands in the dictionaries too, where the loop chunks say nothing
-    double statedTempo = 0;     // in beats per minute, of a chunk that says it
-    std::map<std::string, std::string, std::less<>> sources; // of what it said: by the names of tags, its chunks
+    FourCC fileType = 0;                        // "AIFF", "AIFC", "caff", "WAVE", "RIFX" or "W64f"
+    double sampleRate = 0;                      // in Hz
+    std::uint64_t frames = 0;                   // of the sound
+    platform::Dictionary combined;              // under the VireoLoopCombinedTagsChunkData keys
+    platform::Dictionary info;                  // under the VireoLoopFileInfoChunkData keys
+    std::vector<VireoLoopTransient> transients; // in the order of the file
+    std::vector<Chunk> chunks;                  // the chunks that are carried uninterpreted
+    bool hasLoopChunks = false;                 // of this library's kind
+    SamplerTags sampler;    // its values are in the dictionaries too, where the loop chunks have none
+    double statedTempo = 0; // in beats per minute, if a chunk states it; else 0
+    /// of the values of `sampler`: chunks by the names of tags
+    std::map<std::string, std::string, std::less<>> sources;
 
-    /// The number or text under a key of either dictionary; 0 or "" when there is none.
+    /// Each the number or text under a key of either dictionary; 0 or "" for none.
     std::int64_t number(std::string_view key) const;
     std::string text(std::string_view key) const;
-    /// Beats per minute, as stated, or from the beats; 0 when neither is known.
+    /// Beats per minute, as stated or from the beats; 0 when neither is known.
     double tempo() const;
-    /// Whether any loop chunk is there, or the chunks of samplers describe a loop; texts such as a title, which any
-    /// file may have, do not make one.
+    /// Whether there is a loop chunk, or the chunks of samplers describe a loop. Texts such as a title, which any
+    /// file may have, make no loop.
     bool isLoop() const { return hasLoopChunks || sampler.describeLoop(frames); }
     bool isEmpty() const { return combined.empty() && info.empty() && transients.empty() && chunks.empty(); }
 };
 
-/// Reads all that is known of a file as a loop, and of the chunks that are not interpreted only the sizes. None for a
-/// file that cannot be read, and for one of another kind (LoopTagsError.h).
+/// Reads everything known of a file as a loop, and only the sizes of chunks that are not interpreted. Null for a file
+/// that cannot be read, and for one of another kind (LoopTagsError.h).
 KT_EXPORT std::optional<LoopTags> readLoopTags(const platform::URLRef& file, platform::Error* error = nullptr);
-/// The same for edits: of AIFF and CAF files the loop chunks alone, of WAVE what its own chunks say.
+/// The same for edits: of AIFF and CAF files the loop chunks alone, of WAVE its own chunks.
 KT_EXPORT std::optional<LoopTags> readOwnLoopTags(const platform::URLRef& file, platform::Error* error = nullptr);
-/// What `sampler` says, where the tags say nothing yet.
+/// Adds the values of `sampler` where the tags have none.
 KT_EXPORT void addSamplerTags(LoopTags& tags, SamplerTags sampler);
 
-/// What openLoopFile takes.
+/// Which files openLoopFile takes.
 enum class LoopFiles { withLoopChunks, waveToo };
-/// Opens a file that can hold loop chunks, or WAVE where that is asked for; none for another.
+/// Opens a file that can hold loop chunks, or WAVE if that is wanted; null for others.
 KT_EXPORT std::optional<VireoLoopChunksManager> openLoopFile(const platform::URLRef& file,
                                                              platform::AudioFile::Permission permission,
                                                              LoopFiles kinds = LoopFiles::withLoopChunks,
                                                              platform::Error* error = nullptr);
-/// The chunks of an open file that hold loop tags or are carried, whether they can be read or not.
+/// The chunks of an open file that hold loop tags or are carried, readable or not.
 KT_EXPORT std::vector<LoopTags::Chunk> loopChunksOf(VireoLoopChunksManager& manager);
 
 /// "AIFF", "CAF", "WAVE".
@@ -68,21 +69,21 @@ KT_EXPORT std::string loopContainerName(FourCC fileType);
 /// "4/4"; empty unless both parts are there.
 KT_EXPORT std::string loopSignature(const LoopTags& tags);
 
-/// A tag by its name (LoopTagFields.h): a number, a text or a list.
+/// A tag by its name (LoopTagFields.h).
 struct LoopTagValue {
-    std::string name;
-    platform::Value value;
+    std::string name;      // as in LoopTagField
+    platform::Value value; // a number, a text or a list
 };
-/// Null and zero, empty texts and empty lists are no tag.
+/// Whether a value means no tag: null, zero, an empty text, an empty list.
 KT_EXPORT bool isAbsentLoopTag(const platform::Value& value);
-/// All tags that are present, in the order of loopTagFields, then "tempo", which follows from others; not the
+/// All tags that are present, in the order of loopTagFields, then "tempo", which follows from others; without the
 /// transients and the chunks.
 KT_EXPORT std::vector<LoopTagValue> loopTagValues(const LoopTags& tags);
-/// The same with what is known of the sound first ("fileType", "containerName", "sampleRate", "frames",
-/// "durationSeconds"), and words behind the numbers that stand for them ("key", "mode", "signature").
+/// The same, after facts of the sound ("fileType", "containerName", "sampleRate", "frames", "durationSeconds"), and
+/// with words for the numbers that have some ("key", "mode", "signature").
 KT_EXPORT std::vector<LoopTagValue> loopTagRecord(const LoopTags& tags);
-/// Of all values the chunk that says them: where no sampler's chunk does, a loop chunk. By the AIFF ids in either kind
-/// of file, but for the texts of CAF, which stand in "info".
+/// The chunk of each value: a sampler's chunk or else a loop chunk, by AIFF ids in both kinds of file; the texts of
+/// CAF are in "info".
 KT_EXPORT std::map<std::string, std::string, std::less<>> loopTagSources(const LoopTags& tags);
 /// "forward", "alternating", "backward" or "other".
 KT_EXPORT const char* loopKindName(SamplerTags::Loop::Kind kind);

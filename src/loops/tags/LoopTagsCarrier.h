@@ -1,5 +1,5 @@
-// Writes tags and texts of one file into the chunks of another: as they stand between files of one kind, by their
-// meaning between AIFF and CAF.
+// Tags and texts of one file put into the chunks of another: unchanged between files of one kind, by their meaning
+// between AIFF and CAF.
 #pragma once
 
 #include "loops/tags/LoopTags.h"
@@ -8,12 +8,13 @@
 #include <string>
 #include <vector>
 
-/// Treats each field separately: one that cannot be kept is reported and does not affect others.
+/// Carries each field by itself: one that cannot be kept is reported, and costs no other.
 class LoopTagsCarrier {
 public:
-    /// `tags` and `from` are of the same file.
+    /// `tags` and `from` are of the same file; everything is borrowed.
     LoopTagsCarrier(const LoopTags& tags, const RawLoopTags& from, RawLoopTags& to, std::vector<std::string>& notKept);
 
+    /// Does it; fields that are lost are in `notKept`, in words.
     void carry();
 
 private:

@@ -9,44 +9,45 @@
 #include <span>
 #include <string>
 
-/// A field and its new value: null to clear it; of transients an array of frames, with each type other than 1 as an
-/// array of frame and type.
+/// A field and its new value: null clears it; for transients, an array of frames, or of frame and type for types
+/// other than 1.
 struct LoopTagAssignment {
-    const LoopTagField* field;
-    platform::Value value;
+    const LoopTagField* field; // borrowed from loopTagFields
+    platform::Value value;     // of the field's kind, or null
 };
 
-/// Puts the values in the place of what the fields hold: other bytes stay. An absent value takes what is there away,
-/// also where it cannot be read, and so does one that the container has no form for: reading tells. A chunk in which
-/// nothing is left goes. Both parts of a signature belong together in CAF; the one that is not named stays. Transients
-/// are not assigned so. False for a chunk whose layout is not known; `tags` are of no use then.
+/// Replaces the values of the fields; other bytes stay. A null value, and one that the container has no form for,
+/// removes what is there, even if it cannot be read. A chunk that becomes empty is removed. In CAF both parts of a
+/// signature are one; the part that is not named stays. Does not assign transients. False for a chunk of unknown
+/// layout; `tags` are of no use then.
 KT_EXPORT bool assignLoopTags(RawLoopTags& tags, std::span<const LoopTagAssignment> assignments,
                               platform::Error* error = nullptr);
 
-/// What a text field holds, as bytes: to its NUL, and of comments the first one's text. None where nothing is.
+/// The bytes of a text field, up to its NUL, and of comments the first one's text; null for none.
 std::optional<std::string> rawLoopText(const RawLoopTags& tags, const LoopTagField& field);
-/// The same of the descriptors, in their order.
+/// The bytes of the descriptors, in their order.
 std::vector<std::string> rawLoopDescriptors(const RawLoopTags& tags);
 /// Title, artist, copyright and comments as the library reads them.
 platform::Dictionary loopTextsOf(const RawLoopTags& tags);
 
-/// Between CAF files: the field's pair as it stands; false when there is none. Both parts of a signature are one.
+/// Copies the field's pair between CAF files, unchanged; false when there is none. Both parts of a signature are one
+/// pair.
 bool copyLoopPair(RawLoopTags& to, const RawLoopTags& from, const LoopTagField& field);
-/// The pair's text; none in AIFF files.
+/// The pair's text; null in AIFF files.
 std::optional<std::string> loopPairText(const RawLoopTags& tags, const LoopTagField& field);
-/// Whether there is a chunk "cate" from which nothing can be taken.
+/// Whether there is a chunk "cate" that cannot be read.
 bool hasUnknownLoopCategories(const RawLoopTags& tags);
 
-/// The transients as the bytes have them. The chunk's fields beside the list stay, records of frames that stay too.
+/// Replaces the transients. The chunk's other fields stay, and so do records whose frames stay.
 void assignLoopTransients(RawLoopTags& tags, const std::vector<VireoLoopTransient>& transients);
-/// The fields beside the list.
+/// The fields of a transients chunk besides the list.
 struct LoopTransientFields {
-    std::uint16_t version = 1;
-    std::uint16_t detectionPercentage = 0;
-    std::uint16_t forceDivision = 0;
+    std::uint16_t version = 1;             // of the chunk
+    std::uint16_t detectionPercentage = 0; // of the program that found the transients
+    std::uint16_t forceDivision = 0;       // of the program that found the transients
     friend bool operator==(const LoopTransientFields&, const LoopTransientFields&) = default;
 };
-/// None when there is no chunk that can be read.
+/// The fields; null when there is no readable chunk.
 std::optional<LoopTransientFields> loopTransientFieldsOf(const RawLoopTags& tags);
-/// There must be a chunk.
+/// Replaces the fields; there must be a chunk.
 void assignLoopTransientFields(RawLoopTags& tags, const LoopTransientFields& fields);

@@ -2,6 +2,7 @@
 #pragma once
 
 #if defined(__GNUC__)
+/// What hosts may call.
 #define KT_EXPORT __attribute__((visibility("default")))
 #else
 #define KT_EXPORT

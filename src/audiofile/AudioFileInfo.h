@@ -60,7 +60,8 @@ struct KT_EXPORT AudioFileInfo {
     std::int32_t bytesPerFrame = 0;   // of linear PCM; samples left-aligned in their containers
     std::int64_t dataSize = 0;        // sample bytes that the file holds
     std::int64_t missingDataSize = 0; // sample bytes that the header promises beyond the end of the file
-    TAudioBusFormat busFormat = kAudioBusUndefined; // as the header names the speakers; undefined otherwise
+    TAudioBusFormat busFormat =
+        kAudioBusUndefined;      // of the speakers that the header names, else the first for so many channels
     std::int32_t sourceBits = 0; // of a sample those that count: 20 of 24; of lossless codings those of what was coded;
                                  // else 0
 

@@ -56,13 +56,13 @@ public:
     unsigned int BitDepth() const { return dataFormat_.bitsPerChannel; }
     /// "WAVE", "AIFF", "AIFC" or "caff"; 0 before the first file.
     FourCC FileType() const { return fileType_; }
-    /// In Hz, rounded down.
+    /// In Hz, rounded down; 0 for a rate beyond 32 bits.
     unsigned int SampleRate() const;
     /// As counted when the file was opened: writing does not change it. 0 for samples of less than a byte.
     std::int64_t NumFrames() const;
     /// How many bytes that many frames take.
     std::int64_t FramesToBytes(long frames) const;
-    /// How many whole frames fit in that many bytes.
+    /// How many whole frames fit in that many bytes; 0 for samples of less than a byte.
     std::int64_t BytesToFrames(unsigned long long bytes) const;
     /// Whether samples are big-endian; of 8-bit data whether they are unsigned, as in "WAVE".
     bool Swapped() const;

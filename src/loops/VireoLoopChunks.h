@@ -78,7 +78,7 @@ public:
     VireoLoopEvSeqChunk() : VireoLoopBaseChunk(tagging::kEventSequence) {}
 };
 
-/// "adLD", data of later versions, not interpreted.
+/// "adLD", additional loop data, not interpreted.
 class KT_EXPORT VireoLoopAdditionalChunk : public VireoLoopBaseChunk {
 public:
     VireoLoopAdditionalChunk() : VireoLoopBaseChunk(tagging::kAdditionalLoopData) {}

@@ -16,7 +16,7 @@ public:
     {
     }
 
-    /// 1 for a beat; other types are kept as they are.
+    /// The type in the file, kept as it is.
     std::int32_t transientType() const { return _transientType; }
     void setTransientType(std::int32_t transientType) { _transientType = transientType; }
     /// The position in the sound, in frames.

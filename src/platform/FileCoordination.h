@@ -54,7 +54,7 @@ public:
 
     /// The item, asked once, when the presenter is registered.
     virtual URLRef presentedItemURL() const = 0;
-    /// Where requests run; it must outlive the registration.
+    /// The queue on which requests run; asked once, when the presenter is registered.
     virtual OperationQueue& presentedItemOperationQueue() = 0;
     /// Called ahead of a read. It may block, or keep the reacquirer and return; the access waits for the answer.
     virtual void relinquishPresentedItemToReader(Reacquirer reacquirer) = 0;

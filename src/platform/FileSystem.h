@@ -13,7 +13,7 @@ namespace platform {
 /// The opaque handle of an existing item, of fixed size. It finds the item again, until the system restarts, after it
 /// was renamed in its folder. All zeros mean none.
 struct FileHandle {
-    std::array<std::byte, 4160> bytes{}; // opaque; docs/formats/bookmark.md does not cover them
+    std::array<std::byte, 4160> bytes{}; // opaque
     friend bool operator==(const FileHandle&, const FileHandle&) = default;
 };
 

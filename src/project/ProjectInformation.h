@@ -73,19 +73,19 @@ public:
     // One alternative's metadata; 0, false or null when absent. A negative index means lastActiveVariation().
     /// In Hz.
     std::uint64_t sampleRate(long index);
-    /// The tempo at the start.
+    /// The tempo.
     double beatsPerMinute(long index);
     /// A row of the application's table of frame rates.
     std::int64_t frameRateIndex(long index);
-    /// Whether positions count time rather than bars.
+    /// The flag `isTimeCodeBased` of the metadata.
     bool isTimeCodeBased(long index);
-    /// Whether the alternative has a grid of cells.
+    /// The flag `HasGrid` of the metadata.
     bool hasGrid(long index);
     /// A row of the application's table of surround formats.
     std::int64_t surroundFormatIndex(long index);
     /// A row of the application's table of surround modes.
     std::int64_t surroundModeIndex(long index);
-    /// The key, a number of the application.
+    /// `SignatureKey`, a number of the application.
     std::int64_t signKey(long index);
     /// Beats in a bar.
     std::int64_t timeSignatureNumerator(long index);

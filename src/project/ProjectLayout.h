@@ -17,9 +17,9 @@ inline constexpr std::array<const char*, 3> alternatives{"Alternatives", "Variat
 inline constexpr const char* metaData = "MetaData.plist";            // what ProjectInformation reads of the alternative
 inline constexpr const char* metaDataCopy = "MetaData.bak";          // the copy before
 inline constexpr const char* windowImage = "WindowImage.jpg";        // a picture of the window
-inline constexpr const char* oldDisplayState = "DisplayState.plist"; // of older versions
-inline constexpr const char* displayStateArchive = "DisplayStateArchive";     // of the window
-inline constexpr const char* displayStateMobile = "DisplayStateMobile.plist"; // of the window, on mobile devices
+inline constexpr const char* oldDisplayState = "DisplayState.plist"; // of the display, in older versions
+inline constexpr const char* displayStateArchive = "DisplayStateArchive";     // of the display
+inline constexpr const char* displayStateMobile = "DisplayStateMobile.plist"; // of the display, on mobile devices
 inline constexpr const char* projectData = "ProjectData";                     // the project itself
 inline constexpr const char* araFiles = "ARA Files";                          // data of plug-ins
 inline constexpr const char* autosave = "Autosave";                           // unsaved changes

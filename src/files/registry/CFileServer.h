@@ -27,7 +27,7 @@ public:
     CFileServer(const CFileServer&) = delete;
     CFileServer& operator=(const CFileServer&) = delete;
 
-    /// The smallest id that no file has a client of. Asking does not register it.
+    /// The smallest id that is not registered. Asking does not register it.
     unsigned int CreateNewClientId() const;
     /// Registers a client of a file, and returns the number of the file's clients. kRefused for id 0, for a reference
     /// that is no existing file, and for a new file beyond `maxFiles`; 0 when the file cannot be opened or loaded.
@@ -58,7 +58,7 @@ public:
     /// buffer for the whole process, which the next call overwrites.
     const char* GetFileNameFromFirstRef(unsigned int clientId, bool keepExtension) const;
 
-    /// Whether the id is in `ids`, which must be sorted.
+    /// Whether the id is among `ids`.
     bool ClientIsRegistered(unsigned int clientId, std::vector<unsigned int>& ids) const;
     /// The greatest of the ids; 0 when there are none.
     unsigned int MaxClientId(std::vector<unsigned int>& ids) const;

@@ -277,6 +277,13 @@ static int seeChunk(void* context, const ktf_chunk* chunk)
     return --seen->most == 0;
 }
 
+#ifdef __cplusplus
+static int throwOut(void*, const ktf_chunk*)
+{
+    throw "out of the callback";
+}
+#endif
+
 static void checkChunks(const char* wave)
 {
     const uint32_t note = KTF_CODE('n', 'o', 't', 'e');
@@ -292,6 +299,9 @@ static void checkChunks(const char* wave)
     seen.most = 2;
     EXPECT_OK(ktf_each_chunk(file, seeChunk, &seen));
     EXPECT(strcmp(seen.ids, "fmt data") == 0);
+#ifdef __cplusplus
+    EXPECT_STATUS(ktf_each_chunk(file, throwOut, NULL), KTF_FAILED);
+#endif
     EXPECT_OK(ktf_find_chunk(file, note, &chunk, sizeof chunk));
     EXPECT(chunk.id == note && chunk.size == 5 && chunk.body == chunk.offset + 8);
     EXPECT(chunk.offset == kHeader + 4 * kFrames);
@@ -354,8 +364,9 @@ static void checkEdits(void)
     /* Who holds the file says so, or waits for himself. */
     EXPECT_OK(ktf_lock(path, KTF_LOCK_WRITE, 0, &access));
     options.flags = KTF_EDIT_IN_PLACE | KTF_EDIT_KEEP_TIMES;
-    options.timeout = mayWait ? 0.02 : 0;
-    EXPECT_STATUS(ktf_add_chunk(path, note, "held", 4, &options), KTF_BUSY);
+    options.timeout = 0.02;
+    if (mayWait)
+        EXPECT_STATUS(ktf_add_chunk(path, note, "held", 4, &options), KTF_BUSY);
     options.flags |= KTF_EDIT_LOCKED;
     EXPECT_OK(ktf_add_chunk(path, note, "held", 4, &options));
     ktf_unlock(&access);

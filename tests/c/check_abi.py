@@ -1,4 +1,4 @@
-"""Checks that the library exports what programs were linked with (docs/abi.md).
+"""Checks that the library exports what programs were linked with (docs/guide/abi.md).
 
 Of the interfaces for C, ktf_… and XStream…, the list is exact: symbols.txt, what the library exports, and what the headers
 declare are one. Of C++ what symbols-cxx.txt lists must be there, and more may be.
@@ -31,6 +31,21 @@ def declared(root):
     return names
 
 
+def private_members(root):
+    """What no host calls, though it is exported with its class: "Class::name", of the classes at the left margin of headers."""
+    hidden, shown = set(), set()
+    for header in (root / "src").rglob("*.h"):
+        name = access = None
+        for line in header.read_text(encoding="utf-8").splitlines():
+            if begun := re.match(r"(class|struct) (?:KT_EXPORT )?(\w+)\b[^;]*$", line):
+                name, access = begun[2], "private" if begun[1] == "class" else "public"
+            elif label := re.match(r"(public|protected|private):", line):
+                access = label[1]
+            elif name:
+                (hidden if access == "private" else shown).update(f"{name}::{each}" for each in re.findall(r"(~?\w+)\(", line))
+    return hidden - shown
+
+
 def spelled(names):
     """Names as people read them."""
     text = "\n".join(sorted(names))
@@ -57,7 +72,10 @@ def problems_of(library, root, version):
 
 
 def write(library, root):
+    hidden = private_members(root)
     for kind, names in exported(library).items():
+        members = (re.search(r"(\w+::~?\w+)\(", text) for text in spelled(names))
+        names = {name for name, member in zip(sorted(names), members) if not member or member[1] not in hidden}
         (root / LISTS[kind]).write_text("".join(name + "\n" for name in sorted(names)), encoding="utf-8")
 
 

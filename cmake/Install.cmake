@@ -21,7 +21,7 @@ endif()
 
 # The headers of implementations (platform/posix/ and the like) are nobody's business.
 foreach(room platform/core platform files loops/tagging audiofile audiofile/fields audiofile/metadata files/registry loops loops/overview
-        loops/tags adm coordination project)
+        loops/tags adm adm/files coordination project)
     file(GLOB headers CONFIGURE_DEPENDS ${PROJECT_SOURCE_DIR}/src/${room}/*.h)
     install(FILES ${headers} DESTINATION ${CMAKE_INSTALL_INCLUDEDIR}/KTFiles/${room} COMPONENT development)
 endforeach()

@@ -1,9 +1,7 @@
 # kt_add_xmltext(TARGET): XML that is edited as text, which belongs to the command and not to a room.
 function(kt_add_xmltext target)
     find_package(fmt REQUIRED)
-    find_package(PkgConfig REQUIRED)
-    pkg_check_modules(utf8proc REQUIRED IMPORTED_TARGET libutf8proc)
-    target_sources(${target} PRIVATE ${PROJECT_SOURCE_DIR}/tool/meta/XMLText.cpp ${PROJECT_SOURCE_DIR}/tool/shared/output/DisplayWidth.cpp)
+    target_sources(${target} PRIVATE ${PROJECT_SOURCE_DIR}/tool/meta/XMLText.cpp)
     target_include_directories(${target} PRIVATE ${PROJECT_SOURCE_DIR})
-    target_link_libraries(${target} PRIVATE fmt::fmt PkgConfig::utf8proc)
+    target_link_libraries(${target} PRIVATE fmt::fmt)
 endfunction()

@@ -1,15 +1,21 @@
-#include "tool/adm/AdmJson.h"
+#include "adm/ADMJson.h"
 
 #include "adm/ADMAudioBlockFormat_DirectSpeaker.h"
 #include "adm/ADMAudioBlockFormat_Object.h"
-#include "tool/adm/AdmWords.h"
-#include "tool/shared/output/JsonWriter.h"
+#include "platform/core/JsonWriter.h"
 
 namespace {
 
 std::optional<std::int64_t> knownTime(std::int64_t microseconds)
 {
     return microseconds == kADMInvalidTime ? std::nullopt : std::optional(microseconds);
+}
+
+/// What is unknown when it is zero or less.
+template <class Number>
+std::optional<Number> positive(Number number)
+{
+    return number > 0 ? std::optional(number) : std::nullopt;
 }
 
 void writeLabels(JsonWriter& json, std::string_view key, const ADMLabels& labels)
@@ -99,7 +105,7 @@ void writeMembers(JsonWriter& json, const ADMAudioPackFormat& pack)
     json.member("audioPackFormatID", pack.audioPackFormatID());
     json.knownMember("audioPackFormatName", pack.audioPackFormatName());
     json.member("type", pack.type());
-    json.member("importance", signedImportance(pack));
+    json.member("importance", static_cast<std::int64_t>(pack.importance())); // one below zero is kept unsigned
     json.knownMember("absoluteDistance", pack.absoluteDistance());
     json.member("audioChannelFormatIDRefs", pack.audioChannelFormatIDRefs());
     json.member("audioPackFormatIDRefs", pack.audioPackFormatIDRefs());
@@ -211,7 +217,7 @@ void writeElements(JsonWriter& json, std::string_view key, const ADMElementTable
 
 } // namespace
 
-void writeAdmJson(JsonWriter& json, const std::string& path, const ADMDocument& document,
+void writeADMJson(JsonWriter& json, const std::string& path, const ADMDocument& document,
                   const std::vector<ADMDiagnostic>* diagnostics)
 {
     json.beginObject();
@@ -227,12 +233,12 @@ void writeAdmJson(JsonWriter& json, const std::string& path, const ADMDocument& 
     if (diagnostics != nullptr) {
         json.newLine();
         json.key("diagnostics");
-        writeDiagnostics(json, *diagnostics);
+        writeADMDiagnostics(json, *diagnostics);
     }
     json.endObject();
 }
 
-void writeDiagnostics(JsonWriter& json, const std::vector<ADMDiagnostic>& diagnostics)
+void writeADMDiagnostics(JsonWriter& json, const std::vector<ADMDiagnostic>& diagnostics)
 {
     json.beginArray();
     for (const ADMDiagnostic& diagnostic : diagnostics) {

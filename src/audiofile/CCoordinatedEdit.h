@@ -28,7 +28,6 @@ public:
     CCoordinatedEdit(const CCoordinatedEdit&) = delete;
     CCoordinatedEdit& operator=(const CCoordinatedEdit&) = delete;
 
-    /// Waits for write access, then as CSafeEdit::Begin. Once only. Further problems: `refused`, with kStatusFileBusy
     /// Waits for write access, then does what CSafeEdit::Begin does. Call it once. A further problem is `refused`,
     /// with kStatusFileBusy when the time is up, or with the status of a system that refuses coordination. A limit
     /// needs a thread, which goes on waiting after the time is up, and gives back what it then gets.

@@ -31,6 +31,7 @@ ARROWS = {
     "loops/overview": {"audiofile", "files", "media/samples", "platform"},
     "loops/tags": {"loops"},
     "adm": {"platform"},
+    "adm/files": {"adm", "audiofile"},
     "project": {"files", "platform"},
     "coordination": {"platform"},
     "files/registry": {"audiofile"},

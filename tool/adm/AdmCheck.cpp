@@ -110,7 +110,7 @@ bool hasElements(const ADMDocument& document)
 
 } // namespace
 
-std::vector<ADMDiagnostic> checkFurther(AdmSource& source, const ADMDocument& document, bool isComplete)
+std::vector<ADMDiagnostic> checkFurther(ADMSource& source, const ADMDocument& document, bool isComplete)
 {
     std::vector<ADMDiagnostic> problems;
     Listener listener(problems);

@@ -3,10 +3,10 @@
 #pragma once
 
 #include "adm/ADMDocument.h"
-#include "tool/shared/adm/AdmSource.h"
+#include "adm/files/ADMSource.h"
 
 #include <vector>
 
 /// Reads the source a second time. `isComplete` if the document was read to its end, without which nobody knows which
 /// elements there are.
-std::vector<ADMDiagnostic> checkFurther(AdmSource& source, const ADMDocument& document, bool isComplete);
+std::vector<ADMDiagnostic> checkFurther(ADMSource& source, const ADMDocument& document, bool isComplete);

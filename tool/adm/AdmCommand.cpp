@@ -1,9 +1,9 @@
 // ktfiles adm: shows an ADM document as a tree or as JSON, and checks it.
+#include "adm/ADMJson.h"
 #include "tool/adm/AdmCheck.h"
-#include "tool/adm/AdmJson.h"
 #include "tool/adm/AdmTree.h"
 #include "tool/shared/access/FileAccess.h"
-#include "tool/shared/adm/AdmSource.h"
+#include "tool/shared/adm/AdmFile.h"
 #include "tool/shared/adm/AdmText.h"
 #include "tool/shared/arguments/CommandLine.h"
 #include "tool/shared/arguments/ThreadsOption.h"
@@ -47,7 +47,7 @@ ADMDocumentOptions optionsFor(const AdmArguments& arguments)
 enum class Diagnose : bool { no, yes };
 
 /// Throws a Failure if the file cannot be read, but not for problems of the document.
-ReadDocument readFrom(AdmSource& source, const AdmArguments& arguments, bool quiet, Diagnose diagnose)
+ReadDocument readFrom(ADMSource& source, const AdmArguments& arguments, bool quiet, Diagnose diagnose)
 {
     ReadDocument read;
     read.document = std::make_unique<ADMDocument>(nullptr);
@@ -124,7 +124,7 @@ public:
 
 private:
     /// Throws OtherKind for an XML file below a folder that is no ADM: web pages begin with a tag, too.
-    static void requireMeant(const FoundFile& file, const AdmSource& source)
+    static void requireMeant(const FoundFile& file, const ADMSource& source)
     {
         if (file.isBelowFolder() && !source.isAudio())
             throw OtherKind("is XML, of any kind", OtherKind::Kind::unknown);
@@ -134,12 +134,12 @@ private:
     {
         const std::string path = shownName(file.path);
         const FileAccess access = accessForReading(file.path, {.quiet = options_.quiet});
-        AdmSource source(file.path);
-        requireMeant(file, source);
-        ReadDocument read = readDocument(source, arguments_.isLenient ? Diagnose::yes : Diagnose::no);
+        const auto source = openAdm(file.path);
+        requireMeant(file, *source);
+        ReadDocument read = readDocument(*source, arguments_.isLenient ? Diagnose::yes : Diagnose::no);
         // Tracking positions takes a ninth longer, so only documents with a problem are read again for them.
         if (!read.isComplete && !arguments_.isLenient)
-            read = readDocument(source, Diagnose::yes);
+            read = readDocument(*source, Diagnose::yes);
         if (!read.isComplete) {
             const ADMDiagnostic last = read.diagnostics.back();
             read.diagnostics.pop_back();
@@ -154,15 +154,15 @@ private:
     std::vector<ADMDiagnostic> check(const FoundFile& file) const
     {
         const FileAccess access = accessForReading(file.path, {.quiet = options_.quiet});
-        AdmSource source(file.path);
-        requireMeant(file, source);
-        ReadDocument read = readDocument(source, Diagnose::yes);
-        for (ADMDiagnostic& problem : checkFurther(source, *read.document, read.isComplete))
+        const auto source = openAdm(file.path);
+        requireMeant(file, *source);
+        ReadDocument read = readDocument(*source, Diagnose::yes);
+        for (ADMDiagnostic& problem : checkFurther(*source, *read.document, read.isComplete))
             read.diagnostics.push_back(std::move(problem));
         return std::move(read.diagnostics);
     }
 
-    ReadDocument readDocument(AdmSource& source, Diagnose diagnose) const
+    ReadDocument readDocument(ADMSource& source, Diagnose diagnose) const
     {
         return readFrom(source, arguments_, options_.quiet || hasSeveral_, diagnose);
     }
@@ -182,7 +182,7 @@ private:
             json.beginObject();
             json.member("path", path);
             json.key("problems");
-            writeDiagnostics(json, found);
+            writeADMDiagnostics(json, found);
             json.endObject();
             json_.end();
         } else if (form_ != Form::none) {
@@ -194,7 +194,7 @@ private:
     void show(const std::string& path, const ReadDocument& read)
     {
         if (form_ == Form::json) {
-            writeAdmJson(json_.begin(), path, *read.document, arguments_.isLenient ? &read.diagnostics : nullptr);
+            writeADMJson(json_.begin(), path, *read.document, arguments_.isLenient ? &read.diagnostics : nullptr);
             json_.end();
             return;
         }

@@ -240,15 +240,10 @@ AdmNode describe(const ADMAudioObject& object)
     return node;
 }
 
-std::int64_t signedImportance(const ADMAudioPackFormat& pack)
-{
-    return static_cast<std::int64_t>(pack.importance());
-}
-
 AdmNode describe(const ADMAudioPackFormat& pack)
 {
     AdmNode node{"pack", pack.audioPackFormatName(), pack.audioPackFormatID(), {ADMGetNameForType(pack.type())}};
-    addImportance(node.details, static_cast<double>(signedImportance(pack)), 10);
+    addImportance(node.details, static_cast<double>(static_cast<std::int64_t>(pack.importance())), 10);
     if (pack.absoluteDistance() != 0)
         node.details.push_back("distances in " + numberText(pack.absoluteDistance()) + " m");
     return node;

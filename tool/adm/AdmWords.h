@@ -26,6 +26,3 @@ AdmNode describe(const ADMAudioTrackFormat& track);
 /// Named after its format or its channel; the details describe the rest of its chain of formats.
 AdmNode describe(const ADMAudioTrackUID& track);
 AdmNode describe(const ADMAudioBlockFormat& block);
-
-/// The library's value is unsigned, so a negative one appears there as a very large number.
-std::int64_t signedImportance(const ADMAudioPackFormat& pack);

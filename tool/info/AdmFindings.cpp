@@ -1,6 +1,7 @@
 #include "tool/info/AdmFindings.h"
 
 #include "media/containers/ContainerCheck.h"
+#include "tool/shared/adm/AdmFile.h"
 #include "tool/shared/adm/AdmTracks.h"
 #include "tool/shared/output/Failure.h"
 
@@ -11,7 +12,7 @@
 namespace {
 
 /// Null if the document was not read to its end; `problem` says why.
-std::unique_ptr<ADMDocument> readDocument(AdmSource& source, ADMDiagnostic& problem)
+std::unique_ptr<ADMDocument> readDocument(ADMSource& source, ADMDiagnostic& problem)
 {
     auto document = std::make_unique<ADMDocument>(nullptr);
     document->setOptions({.continuePastUnresolvedReferences = true, .skipUnsupportedBlocks = true});
@@ -33,12 +34,12 @@ std::unique_ptr<ADMDocument> readDocument(AdmSource& source, ADMDiagnostic& prob
 
 std::vector<AdmFinding> admFindings(const std::string& path, const AdmChunks& chunks)
 {
-    AdmSource source(path, AdmSource::Document::mayLack);
+    const auto source = openAdm(path, ADMSource::Document::mayLack);
     std::unique_ptr<ADMDocument> document;
     std::vector<AdmFinding> findings;
-    if (source.hasDocument() && chunks.document) {
+    if (source->hasDocument() && chunks.document) {
         ADMDiagnostic problem;
-        document = readDocument(source, problem);
+        document = readDocument(*source, problem);
         if (!document)
             findings.push_back(
                 {"documentIsBroken", fourCC("axml"), chunks.document->offset,
@@ -46,7 +47,7 @@ std::vector<AdmFinding> admFindings(const std::string& path, const AdmChunks& ch
                  "renderers refuse the file, or take it for one without ADM"});
     }
     const ChunkEntry& place = chunks.tracks ? *chunks.tracks : *chunks.document;
-    std::vector<ADMDiagnostic> problems = trackProblems(source, document.get());
+    std::vector<ADMDiagnostic> problems = trackProblems(*source, document.get());
     problems.resize(std::min(problems.size(), platform::kMostFindings));
     for (const ADMDiagnostic& problem : problems)
         findings.push_back({"tracksDiffer", place.id, place.offset, "is off: " + problem.text,

@@ -11,7 +11,7 @@
 
 namespace {
 
-constexpr FourCC kBext = fourCC("bext");
+constexpr FourCC kBextId = fourCC("bext");
 
 /// Creates a chunk of version 1 if the file has none.
 template <class Change>
@@ -19,7 +19,7 @@ void changeBext(MetaEdit& edit, const MetaStep& step, Change change)
 {
     BroadcastExtension fresh;
     fresh.version = 1;
-    edit.change(step, kBext, fresh, change);
+    edit.change(step, kBextId, fresh, change);
 }
 
 template <auto member>
@@ -180,7 +180,7 @@ constexpr MetaRule kBextRules[] = {
     {"bext.maxShortTermLoudness", K::decimal, {-99.99, 99.99}, setLoudness<4>},
     {"bext.codingHistory", K::ascii, kAnyLength, setHistory},
     {"bext.codingHistory[N]", K::line, kAnyLength, setHistoryLine},
-    {"bext", K::none, {}, removeChunk<kBext>},
+    {"bext", K::none, {}, removeChunk<kBextId>},
 };
 
 } // namespace

@@ -1,9 +1,9 @@
 #include "tool/meta/MetaText.h"
 
+#include "platform/core/JsonWriter.h"
 #include "tool/shared/output/ClockTime.h"
 #include "tool/shared/output/DisplayWidth.h"
 #include "tool/shared/output/HeadingName.h"
-#include "tool/shared/output/JsonWriter.h"
 
 #include <algorithm>
 

@@ -2,7 +2,7 @@
 
 #include "platform/XMLParser.h"
 #include "platform/core/ASCIICase.h"
-#include "tool/shared/output/DisplayWidth.h"
+#include "platform/core/UTF8.h"
 #include "tool/shared/output/Failure.h"
 
 #include <fmt/format.h>
@@ -132,7 +132,7 @@ std::string XMLText::escaped(std::string_view value, bool isAttribute) const
         const char c = value.front();
         if (static_cast<unsigned char>(c) >= 0x80) {
             const std::string_view before = value;
-            const char32_t code = takeCharacter(value);
+            const char32_t code = platform::takeCharacter(value);
             if (takesUTF8_)
                 text += before.substr(0, before.size() - value.size());
             else

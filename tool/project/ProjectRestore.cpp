@@ -1,10 +1,10 @@
 #include "tool/project/ProjectRestore.h"
 
+#include "platform/core/JsonWriter.h"
 #include "tool/project/ProjectEdit.h"
 #include "tool/project/ProjectPackage.h"
 #include "tool/project/ProjectReport.h"
 #include "tool/shared/output/Failure.h"
-#include "tool/shared/output/JsonWriter.h"
 #include "tool/shared/output/Terminal.h"
 
 #include <fmt/format.h>

@@ -1,9 +1,9 @@
 #include "loops/tags/LoopTagsCopy.h"
 
 #include "loops/tags/LoopTagFields.h"
-#include "loops/tags/LoopTagsCarrier.h"
 #include "loops/tags/LoopTagsPatch.h"
 #include "loops/tags/WaveLoopTags.h"
+#include "loops/tags/bytes/LoopTagsCarrier.h"
 #include "media/containers/ContainerHeaders.h"
 
 #include <algorithm>

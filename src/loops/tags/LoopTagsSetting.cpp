@@ -2,7 +2,7 @@
 
 #include "loops/VireoLoopTerms.h"
 #include "loops/tags/LoopTagsError.h"
-#include "loops/tags/LoopTagsLayouts.h"
+#include "loops/tags/bytes/LoopTagsLayouts.h"
 #include "media/containers/ContainerHeaders.h"
 #include "platform/String.h"
 
@@ -221,7 +221,7 @@ bool canBeSet(const LoopTags& tags, platform::Error* error)
                         " file; tags are set and removed in AIFF and CAF files only");
 }
 
-std::optional<RawLoopTags> bytesOf(const platform::URLRef& file, platform::Error* error)
+std::optional<RawLoopTags> rawTagsOf(const platform::URLRef& file, platform::Error* error)
 {
     auto manager = openLoopFile(file, platform::AudioFile::Permission::read, LoopFiles::withLoopChunks, error);
     return manager ? readRawLoopTags(*manager, error) : std::nullopt;
@@ -261,7 +261,7 @@ std::optional<LoopTagsPlan> planLoopTagAssignments(const LoopTags& before, const
             failForValue(error, *assignment.field);
             return std::nullopt;
         }
-    auto bytes = canBeSet(before, error) ? bytesOf(file, error) : std::nullopt;
+    auto bytes = canBeSet(before, error) ? rawTagsOf(file, error) : std::nullopt;
     if (!bytes)
         return std::nullopt;
     std::optional<LoopTagsPlan> planned(std::in_place);

@@ -5,8 +5,8 @@
 #include "loops/VireoLoopTerms.h"
 #include "loops/tags/LoopTagFields.h"
 #include "loops/tags/LoopTagsError.h"
-#include "loops/tags/LoopTagsLayouts.h"
 #include "loops/tags/LoopTagsPatch.h"
+#include "loops/tags/bytes/LoopTagsLayouts.h"
 #include "media/containers/ContainerHeaders.h"
 
 #include <algorithm>

@@ -1,8 +1,7 @@
-#include "tool/shared/output/JsonWriter.h"
+#include "platform/core/JsonWriter.h"
 
-#include "tool/shared/output/ClockTime.h"
-#include "tool/shared/output/DisplayWidth.h"
-#include "tool/shared/output/UnseenCharacters.h"
+#include "platform/core/DateText.h"
+#include "platform/core/UTF8.h"
 
 #include <algorithm>
 
@@ -48,6 +47,17 @@ std::string base64(const Bytes& bytes)
     return text;
 }
 
+/// "\\u00ad", of a code below 0x10000.
+std::string_view escapeOf(std::uint32_t code, char (&text)[6])
+{
+    constexpr char digits[] = "0123456789abcdef";
+    text[0] = '\\';
+    text[1] = 'u';
+    for (std::size_t i = 0; i < 4; ++i)
+        text[2 + i] = digits[code >> (12 - 4 * i) & 15];
+    return {text, sizeof text};
+}
+
 } // namespace
 
 JsonWriter& JsonWriter::write(std::string_view text)
@@ -77,17 +87,20 @@ void JsonWriter::putEscaped(std::string_view text)
     constexpr std::string_view kEscaped = "\"\\\b\f\n\r\t", kLetters = "\"\\bfnrt";
     while (!text.empty()) {
         std::string_view bytes = text;
-        const char32_t code = takeCharacter(text);
+        const char32_t code = platform::takeCharacter(text);
         bytes.remove_suffix(text.size());
         if (const std::size_t found = kEscaped.find(bytes); found != kEscaped.npos) {
             put('\\');
             put(kLetters[found]);
-        } else if (code >= 0x20 && !isLateControl(code) && !isUnseen(code)) {
+        } else if (code >= 0x20 && !platform::isLateControl(code) && !platform::isUnseen(code)) {
             put(code == 0xFFFD ? "\xEF\xBF\xBD" : bytes);
         } else if (const auto number = static_cast<std::uint32_t>(code); number < 0x10000) {
-            put(fmt::format("\\u{:04x}", number));
+            char escape[6];
+            put(escapeOf(number, escape));
         } else { // as a pair of surrogates
-            put(fmt::format("\\u{:04x}\\u{:04x}", 0xD7C0 + (number >> 10), 0xDC00 + (number & 0x3FF)));
+            char escape[6];
+            put(escapeOf(0xD7C0 + (number >> 10), escape));
+            put(escapeOf(0xDC00 + (number & 0x3FF), escape));
         }
     }
 }
@@ -119,7 +132,7 @@ JsonWriter& JsonWriter::write(const platform::Value& value)
         } else if constexpr (std::is_same_v<Content, Bytes>) {
             write(base64(content));
         } else if constexpr (std::is_same_v<Content, platform::Date>) {
-            write(dateText(content));
+            write(platform::dateText(content));
         } else if constexpr (std::is_same_v<Content, platform::Dictionary>) {
             beginObject();
             for (const auto& [key, element] : content)

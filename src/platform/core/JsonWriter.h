@@ -1,8 +1,9 @@
-// All JSON that the command writes: as it comes, so that nothing is held as a tree of values first.
+// JSON, written as it comes, so that nothing is held as a tree of values first.
 #pragma once
 
+#include "platform/core/Export.h"
+#include "platform/core/TextBuffer.h"
 #include "platform/core/Value.h"
-#include "tool/shared/output/Output.h"
 
 #include <charconv>
 #include <cmath>
@@ -14,23 +15,18 @@
 #include <string_view>
 #include <vector>
 
-/// A number that is unknown when it is zero or less, as knownMember() takes it.
-template <class Number>
-std::optional<Number> positive(Number number)
-{
-    return number > 0 ? std::optional(number) : std::nullopt;
-}
-
 /// Commas and escapes are its own business; what belongs where is the caller's. Without line breaks but for those that
 /// are asked for.
-class JsonWriter {
+class KT_EXPORT JsonWriter {
 public:
-    explicit JsonWriter(Output& output) : buffer_(output.buffer_), output_(&output) {}
+    /// To the output, by way of its buffer.
+    explicit JsonWriter(TextOutput& output) : buffer_(output.buffer()), output_(&output) {}
     /// Keeps the text, for `text`.
     JsonWriter() : buffer_(ownBuffer_) {}
     JsonWriter(const JsonWriter&) = delete;
     JsonWriter& operator=(const JsonWriter&) = delete;
-    std::string_view text() const { return {ownBuffer_.data(), ownBuffer_.size()}; }
+    /// What was kept.
+    std::string_view text() const { return ownBuffer_.view(); }
 
     JsonWriter& beginObject() { return begin('{'); }
     JsonWriter& endObject() { return end('}'); }
@@ -61,6 +57,7 @@ public:
         return *this;
     }
 
+    /// Ahead of a value of an object.
     JsonWriter& key(std::string_view name)
     {
         write(name);
@@ -80,6 +77,7 @@ public:
         advance(size + 2);
         return *this;
     }
+    /// A key with its value.
     template <class Value>
     JsonWriter& member(const auto& name, const Value& value)
     {
@@ -95,8 +93,11 @@ public:
 
     /// Bytes that are not UTF-8 become U+FFFD; what could not be seen is escaped.
     JsonWriter& write(std::string_view text);
+    /// The same of a text of another type.
     JsonWriter& write(const std::string& text) { return write(std::string_view(text)); }
+    /// The same of a text that ends with a NUL.
     JsonWriter& write(const char* text) { return write(std::string_view(text)); }
+    /// A number, or true or false.
     JsonWriter& write(std::integral auto value)
     {
         if constexpr (std::same_as<decltype(value), bool>)
@@ -113,12 +114,15 @@ public:
     }
     /// The same, with a fraction or an exponent always: 120.0 is no integer.
     JsonWriter& write(double value);
+    /// null, for what is known to be none.
     JsonWriter& writeNull() { return append("null"); }
+    /// The value, or null.
     template <class Value>
     JsonWriter& write(const std::optional<Value>& value)
     {
         return value ? write(*value) : writeNull();
     }
+    /// An array.
     template <class Value>
     JsonWriter& write(const std::vector<Value>& values)
     {
@@ -145,12 +149,11 @@ private:
     /// Where the next `size` bytes go.
     char* room(std::size_t size)
     {
-        if (output_ != nullptr && buffer_.size() + size > Output::kFlushSize)
+        if (output_ != nullptr && buffer_.size() + size > TextOutput::kFlushSize)
             output_->flush();
-        buffer_.try_reserve(buffer_.size() + size);
-        return buffer_.data() + buffer_.size();
+        return buffer_.room(size);
     }
-    void advance(std::size_t size) { buffer_.try_resize(buffer_.size() + size); }
+    void advance(std::size_t size) { buffer_.advance(size); }
     void put(char character)
     {
         *room(1) = character;
@@ -158,7 +161,7 @@ private:
     }
     void put(std::string_view text)
     {
-        if (output_ != nullptr && text.size() > Output::kFlushSize) {
+        if (output_ != nullptr && text.size() > TextOutput::kFlushSize) {
             output_->write(text);
             return;
         }
@@ -203,9 +206,9 @@ private:
         return *this;
     }
 
-    fmt::memory_buffer ownBuffer_;
-    fmt::memory_buffer& buffer_; // its own, or that of the output
-    Output* output_ = nullptr;
+    TextBuffer ownBuffer_;
+    TextBuffer& buffer_; // its own, or that of the output
+    TextOutput* output_ = nullptr;
     bool keepsToOneLine_ = false;
     bool isFirst_ = true; // no comma is needed ahead of what comes next
 };

@@ -3,6 +3,7 @@
 #include "platform/core/ASCIICase.h"
 #include "platform/core/ByteReader.h"
 #include "tool/shared/adm/AdmText.h"
+#include "tool/shared/output/Failure.h"
 
 #include <fmt/format.h>
 
@@ -128,10 +129,13 @@ private:
 
 } // namespace
 
-std::vector<ADMDiagnostic> trackProblems(AdmSource& source, const ADMDocument* document)
+std::vector<ADMDiagnostic> trackProblems(ADMSource& source, const ADMDocument* document)
 {
     std::vector<ADMDiagnostic> problems;
-    if (const auto chunk = source.trackChunk()) {
+    std::optional<Bytes> chunk;
+    if (platform::Error error; !source.readTrackChunk(chunk, &error))
+        throw Failure(error.description);
+    if (chunk) {
         TrackCheck check(source.channels(), problems);
         check.read(*chunk);
         if (document != nullptr)

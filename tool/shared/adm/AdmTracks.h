@@ -2,10 +2,10 @@
 #pragma once
 
 #include "adm/ADMDocument.h"
-#include "tool/shared/adm/AdmSource.h"
+#include "adm/files/ADMSource.h"
 
 #include <vector>
 
 /// `document` is the source's, read to its end, or null if there is none: tracks may use only common definitions.
 /// Reports tracks without a "chna" too. Throws Failure.
-std::vector<ADMDiagnostic> trackProblems(AdmSource& source, const ADMDocument* document);
+std::vector<ADMDiagnostic> trackProblems(ADMSource& source, const ADMDocument* document);

@@ -3,8 +3,8 @@
 #include "loops/VireoLoopTerms.h"
 #include "loops/tags/LoopTagFields.h"
 #include "media/containers/ContainerHeaders.h"
+#include "platform/core/JsonWriter.h"
 #include "tool/shared/arguments/QuotedText.h"
-#include "tool/shared/output/JsonWriter.h"
 #include "tool/shared/output/Output.h"
 
 #include <algorithm>

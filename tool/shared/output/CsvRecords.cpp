@@ -1,7 +1,7 @@
 #include "tool/shared/output/CsvRecords.h"
 
+#include "platform/core/JsonWriter.h"
 #include "tool/shared/output/DisplayWidth.h"
-#include "tool/shared/output/JsonWriter.h"
 #include "tool/shared/output/ShownName.h"
 
 #include <algorithm>

@@ -5,8 +5,6 @@
 
 namespace {
 
-constexpr char32_t kReplacement = 0xFFFD;
-
 // Follows terminals where the library differs from them.
 int widthOf(char32_t character)
 {
@@ -47,29 +45,6 @@ std::string_view ending(std::string_view text, int width)
 }
 
 } // namespace
-
-char32_t takeCharacter(std::string_view& text)
-{
-    const std::string_view whole = text;
-    const auto byteAt = [whole](std::size_t i) { return static_cast<unsigned char>(whole[i]); };
-    const unsigned lead = byteAt(0);
-    text.remove_prefix(1);
-    if (lead < 0x80)
-        return lead;
-    if (lead < 0xC2 || lead > 0xF4)
-        return kReplacement;
-    const std::size_t length = lead < 0xE0 ? 2 : lead < 0xF0 ? 3 : 4;
-    char32_t code = lead & (0x7FU >> length);
-    for (std::size_t i = 1; i < length; ++i) {
-        const unsigned least = i > 1 ? 0x80 : lead == 0xE0 ? 0xA0 : lead == 0xF0 ? 0x90 : 0x80;
-        const unsigned most = i > 1 ? 0xBF : lead == 0xED ? 0x9F : lead == 0xF4 ? 0x8F : 0xBF;
-        if (i == whole.size() || byteAt(i) < least || byteAt(i) > most)
-            return kReplacement;
-        code = code << 6 | (byteAt(i) & 0x3FU);
-        text.remove_prefix(1);
-    }
-    return code;
-}
 
 bool isShowable(char32_t character)
 {

@@ -1,12 +1,12 @@
 // The width of text on a terminal, and text made to fit: names cut in the middle, sentences broken between words.
 #pragma once
 
+#include "platform/core/UTF8.h"
+
 #include <string>
 #include <string_view>
 
-/// Takes the next character of UTF-8 off `text`. U+FFFD for a byte that begins no character, and for the start of an
-/// incomplete one (The Unicode Standard, table 3-7, and section 3.9 on maximal subparts).
-char32_t takeCharacter(std::string_view& text);
+using platform::takeCharacter;
 
 /// Whether a terminal shows the character or combines it with the one before: not for controls, line separators and
 /// characters unknown to Unicode.

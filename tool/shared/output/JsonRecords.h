@@ -1,8 +1,9 @@
 // A verb's JSON: one array with a record per line, or with --jsonl only the lines.
 #pragma once
 
+#include "platform/core/JsonWriter.h"
 #include "tool/shared/output/Failure.h"
-#include "tool/shared/output/JsonWriter.h"
+#include "tool/shared/output/Output.h"
 
 class JsonRecords {
 public:

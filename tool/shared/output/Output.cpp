@@ -26,18 +26,18 @@ Output& Output::standard()
 
 void Output::write(std::string_view bytes)
 {
-    if (buffer_.size() + bytes.size() >= kFlushSize) {
+    if (buffer().size() + bytes.size() >= kFlushSize) {
         flush();
         writeThrough(bytes);
     } else {
-        buffer_.append(bytes);
+        buffer().append(bytes);
     }
 }
 
 bool Output::flush()
 {
-    writeThrough({buffer_.data(), buffer_.size()});
-    buffer_.clear();
+    writeThrough(buffer().view());
+    buffer().clear();
     return !failed();
 }
 

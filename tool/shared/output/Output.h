@@ -1,6 +1,7 @@
 // Standard output, buffered, without losing track of failures as streams do.
 #pragma once
 
+#include "platform/core/TextBuffer.h"
 #include "tool/shared/output/Terminal.h"
 
 #include <fmt/format.h>
@@ -29,29 +30,28 @@ enum class Form { table, lines, json, csv, none };
 Form outputForm(const OutputOptions& options);
 
 /// The only writer to standard output. After a failed write (full disk, closed pipe) the rest is dropped.
-class Output {
+class Output : public TextOutput {
 public:
     static Output& standard();
 
     template <class... Arguments>
     void print(fmt::format_string<Arguments...> format, Arguments&&... arguments)
     {
-        fmt::format_to(std::back_inserter(buffer_), format, std::forward<Arguments>(arguments)...);
-        if (buffer_.size() >= kFlushSize)
+        formatted_.clear();
+        fmt::format_to(std::back_inserter(formatted_), format, std::forward<Arguments>(arguments)...);
+        buffer().append({formatted_.data(), formatted_.size()});
+        if (buffer().size() >= kFlushSize)
             flush();
     }
-    void write(std::string_view bytes);
-    /// False if anything could not be written.
-    bool flush();
+    void write(std::string_view bytes) override;
+    bool flush() override;
     bool failed() const { return error_ != 0; }
     /// Flushes; false if anything was lost, after a line on standard error unless the reader is gone.
     bool finish();
 
 private:
-    friend class JsonWriter; // formats directly into the buffer
-    static constexpr std::size_t kFlushSize = 64 * 1024;
     void writeThrough(std::string_view bytes);
 
-    fmt::memory_buffer buffer_;
+    fmt::memory_buffer formatted_; // by `print`, kept for its memory
     int error_ = 0;
 };

@@ -1,13 +1,21 @@
 // A verb's data about one file: named values, for both JSON and CSV.
 #pragma once
 
+#include "platform/core/JsonWriter.h"
 #include "platform/core/Value.h"
-#include "tool/shared/output/JsonWriter.h"
+#include "tool/shared/output/Output.h"
 
 #include <optional>
 #include <string>
 #include <utility>
 #include <vector>
+
+/// A number that is unknown when it is zero or less, as knownMember() takes it.
+template <class Number>
+std::optional<Number> positive(Number number)
+{
+    return number > 0 ? std::optional(number) : std::nullopt;
+}
 
 class Record {
 public:

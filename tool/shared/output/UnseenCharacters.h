@@ -1,15 +1,13 @@
 // Characters that disguise a text, or that a terminal takes for a command. Names and tags come from strangers.
 #pragma once
 
+#include "platform/core/UTF8.h"
+
 #include <string>
 #include <string_view>
 
-/// Marks of writing direction, zero-width characters, separators of lines and paragraphs, tags. Not combining
-/// characters and controls.
-bool isUnseen(char32_t character);
-
-/// DEL and the C1 controls.
-bool isLateControl(char32_t character);
+using platform::isLateControl;
+using platform::isUnseen;
 
 /// Whether the text contains such a character or a C1 control. Ignores bytes that are not UTF-8.
 bool isMisleading(std::string_view text);

@@ -1,7 +1,7 @@
-#include "loops/tags/LoopTagsCarrier.h"
+#include "loops/tags/bytes/LoopTagsCarrier.h"
 
 #include "loops/VireoLoopFileInfoChunkDataTypes.h"
-#include "loops/tags/LoopTagsLayouts.h"
+#include "loops/tags/bytes/LoopTagsLayouts.h"
 #include "media/containers/ContainerHeaders.h"
 #include "platform/String.h"
 

@@ -3,7 +3,7 @@
 #include "loops/VireoLoopFileInfoChunkDataTypes.h"
 #include "loops/tagging/Chunks.h"
 #include "loops/tags/LoopTagsError.h"
-#include "loops/tags/LoopTagsLayouts.h"
+#include "loops/tags/bytes/LoopTagsLayouts.h"
 
 #include <cstring>
 #include <set>

@@ -2,7 +2,7 @@
 #include "audiofile/metadata/CAFTextPairs.h"
 #include "loops/VireoLoopCombinedTagsChunkDataTypes.h"
 #include "loops/VireoLoopTerms.h"
-#include "loops/tags/LoopTagsLayouts.h"
+#include "loops/tags/bytes/LoopTagsLayouts.h"
 #include "media/containers/ContainerHeaders.h"
 
 using platform::Value;

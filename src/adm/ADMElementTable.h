@@ -124,7 +124,7 @@ private:
 
         std::array<char, kShortID> id{};
         std::uint8_t size = 0;
-        std::uint32_t entry = 0;    // where it stands in the order
+        std::uint32_t entry = 0;    // its index in the order of the document
         Element* element = nullptr; // null: the slot is free
     };
     /// A cache line: reading one of its slots fetches the other.

@@ -43,7 +43,7 @@ private:
 
     std::string name_;
     std::string value_;
-    std::vector<char> text_; // of the attributes, and room behind it
+    std::vector<char> text_; // the text of the attributes, with spare room after it
     std::vector<platform::XMLAttribute> attributes_;
     platform::XMLPosition documentPosition_;
 };

@@ -62,8 +62,8 @@ struct KT_EXPORT AudioFileInfo {
     std::int64_t missingDataSize = 0; // sample bytes that the header promises beyond the end of the file
     TAudioBusFormat busFormat =
         kAudioBusUndefined;      // of the speakers that the header names, else the first for so many channels
-    std::int32_t sourceBits = 0; // of a sample those that count: 20 of 24; of lossless codings those of what was coded;
-                                 // else 0
+    std::int32_t sourceBits = 0; // the bits of a sample that count, such as 20 of 24; in lossless codings the
+                                 // original's; else 0
 
     // What else the file says about its sound.
     std::uint32_t speakers = 0; // those that the channels feed, as bits of WAVE's channel mask, whatever the channels'

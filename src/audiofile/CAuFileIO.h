@@ -101,7 +101,7 @@ private:
     std::int32_t ReadDescription();
     std::int64_t BytesPerSample() const { return dataFormat_.bitsPerChannel / 8; }
     platform::SampleFormat FileSamples() const;
-    /// Whether frames stand in the file as the sample format and the number of channels say.
+    /// Whether a frame takes just the bytes of its samples.
     bool HasPackedSamples() const;
     std::int32_t ReadSamples(float* dest, std::int64_t startFrame, std::int64_t& frames);
 

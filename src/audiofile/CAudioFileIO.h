@@ -92,7 +92,7 @@ public:
     /// 1 found, 0 not found, or an error. Of several chunks of an id the last is found; in CAF the first with a size
     /// above 0. `data` may be null; else it receives an array for delete[].
     ///
-    /// Kept: of a CAF file whose headers cannot be read, not found; LocateChunk tells.
+    /// Kept: 0 for a CAF file whose headers cannot be read; LocateChunk gives the status.
     std::int32_t FindChunk(unsigned int id, char** data, long* size, long long* position, long long* next);
     /// The same into a record, which owns the body.
     std::int32_t FindChunk(unsigned int id, CChunkData& chunk);
@@ -197,7 +197,7 @@ private:
     bool HasBuiltHeader();
     std::int32_t PrepareToWrite(long long frame, long count);
     void FramesWritten(long long frames);
-    /// Where a chunk stands.
+    /// The position of a chunk.
     struct FoundChunk {
         std::int64_t position = 0; // of the header
         std::int64_t body = 0;

@@ -33,7 +33,7 @@ public:
     /// needs a thread, which goes on waiting after the time is up, and gives back what it then gets.
     FileProblem Begin(const std::string& path, CoordinatedEditOptions options = {});
 
-    /// Each as that of CContainerEdit.
+    /// Each as in CContainerEdit.
     FileProblem Apply(const EditScope& scope, const CSafeEdit::Change& change) { return edit_.Apply(scope, change); }
     const ContainerProblem& Difference() const { return edit_.Difference(); }
     const std::string& Target() const { return edit_.Target(); }

@@ -31,7 +31,7 @@ private:
     struct Entry {
         FourCC id = 0; // 0: the bytes behind the last chunk
         std::int64_t offset = 0;
-        std::int64_t size = 0; // of the body, as far as it is there
+        std::int64_t size = 0; // of the body's bytes that are there
         std::uint32_t digest = 0;
     };
 

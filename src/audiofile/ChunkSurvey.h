@@ -1,4 +1,4 @@
-// What an edit of a container would cost, to be asked ahead of it, since CAudioFileIO does what it is told.
+// What an edit of a container would cost. Callers ask first, since CAudioFileIO makes every edit that it can.
 #pragma once
 
 #include "audiofile/CAudioFileIO.h"

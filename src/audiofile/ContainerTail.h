@@ -12,7 +12,7 @@ struct ContainerTail {
         none,     // nothing, or what CAudioFileIO::PrepareToAppend puts right
         noChunk,  // there is no chunk to follow
         cutShort, // the last chunk claims more than is there, in CAF, or has a negative size
-        noId,     // what stands in place of the last chunk is none
+        noId,     // the bytes in place of the last chunk are no chunk
         stray,    // more than a chunk header, or sound that the chunk's size does not count, follows the last chunk
     };
     Fault fault = Fault::none; // none: a chunk can be added

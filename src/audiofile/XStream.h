@@ -99,8 +99,8 @@ KT_EXPORT int32_t XStreamWriteFrames(XStreamRef stream, XStreamReadRequest* requ
 KT_EXPORT int32_t XStreamReadPackets(XStreamRef stream, XStreamReadRequest* request);
 KT_EXPORT int32_t XStreamWritePackets(XStreamRef stream, XStreamReadRequest* request);
 
-/// Asks the audio-file service, with the handle as it is: of a file that was created it tells ("ffmt", "dfmt", "bcnt",
-/// "pcnt", "doff"); a stream is none of its files, -50. Either result may be null.
+/// The size of a property's value, and whether it can be set. Only created files have any here ("ffmt", "dfmt",
+/// "bcnt", "pcnt", "doff"); -50 for a stream. Either result may be null.
 KT_EXPORT int32_t XStreamGetPropertyInfo(XStreamRef stream, uint32_t id, uint32_t* outSize, uint32_t* outWritable);
 /// "#fmt": the type code of the file, 4 bytes ("!siz" for another size), "AIFF" for AIFC. Others are properties of the
 /// reader (media/decoding/ConvertingReader.h), or else of its underlying file. `*ioSize` is the room, then the value's

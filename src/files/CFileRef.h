@@ -1,4 +1,4 @@
-// CFileRef names a file or folder; everything else in the library is told by it where to work. A value: it owns a
+// CFileRef names a file or folder; the rest of the library takes it wherever a location is needed. A value: it owns a
 // share of one immutable file URL, which holds the path, and caches the item's handle. It never opens the file.
 #pragma once
 

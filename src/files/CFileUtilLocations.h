@@ -3,7 +3,7 @@
 
 #include "files/CFileRef.h"
 
-// Booleans are false for an item of which nothing can be learnt.
+// Booleans are false when the item cannot be examined.
 
 /// Whether the item's volume is read-only.
 KT_EXPORT bool CFileUtilIsReadOnlyVolume(const CFileRef& item);

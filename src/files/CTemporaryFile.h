@@ -51,7 +51,7 @@ private:
 
     platform::OwnedDescriptor folder_;
     std::string targetName_;
-    std::string name_; // empty: it has none of its own any more
+    std::string name_; // empty: the temporary name is gone
     platform::OwnedDescriptor descriptor_;
     int slot_ = -1;
 };

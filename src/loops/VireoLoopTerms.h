@@ -10,7 +10,7 @@
 /// "C" to "B" for the MIDI notes 48 to 59, in which keys are stored, spelt as in CAF files ("Db", but "D#"). Empty
 /// for other notes.
 KT_EXPORT std::string_view VireoLoopNoteName(std::int64_t midiNote);
-/// The MIDI note, 48 to 59, of a key's name: a letter, large or small, with "#" or "b" behind it or nothing; "B#" is
+/// The MIDI note, 48 to 59, of a key's name: a letter, large or small, with "#", "b" or nothing after it; "B#" is
 /// "C". None for other texts.
 KT_EXPORT std::optional<std::int64_t> VireoLoopNoteNamed(std::string_view name);
 

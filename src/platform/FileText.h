@@ -8,7 +8,7 @@
 
 namespace platform {
 
-/// The encoding of texts that are not UTF-8: of AIFF, that of the machines that the format comes from; of other kinds
+/// The encoding of texts that are not UTF-8: in AIFF the one of the machines that the format comes from; in other kinds
 /// of file, Latin-1.
 enum class FallbackEncoding { latin1, macintosh };
 

@@ -9,7 +9,7 @@
 #include <string>
 #include <variant>
 
-/// One chunk, as far as it is held.
+/// One chunk, all of it or its beginning.
 struct MetaChunk {
     FourCC id = 0;           // of the chunk
     std::int64_t offset = 0; // of the header, from the start of the file

@@ -13,8 +13,8 @@ struct AIFFLoop {
     enum Mode : std::int16_t { kNone, kForward, kForwardBackward };
 
     Packed<std::int16_t> mode;        // 0  Mode
-    Packed<std::int16_t> beginMarker; // 2  id of a marker: the first frame played stands behind it
-    Packed<std::int16_t> endMarker;   // 4  id of a marker: the last frame played stands ahead of it
+    Packed<std::int16_t> beginMarker; // 2  id of a marker: the first frame played follows it
+    Packed<std::int16_t> endMarker;   // 4  id of a marker: the last frame played precedes it
 
     /// Turns every number from `order` to the host's order, or back.
     void byteOrder(std::endian order) { turnFields(order, mode, beginMarker, endMarker); }

@@ -70,7 +70,7 @@ public:
 
     // In one pass over lists of many points.
 
-    /// Each adds its kind after the last item, of a point that has none of the kind.
+    /// Each adds a text after the last item, for a point that has no text of that kind.
     void addLabel(std::uint32_t cueId, std::string_view text) { addText(fourCC("labl"), cueId, text); }
     void addNote(std::uint32_t cueId, std::string_view text) { addText(fourCC("note"), cueId, text); }
     /// Changes the fields of every range; their texts stay to the byte.

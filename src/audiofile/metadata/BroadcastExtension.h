@@ -14,7 +14,7 @@ struct BroadcastFields {
     FixedText<256> description;                //   0
     FixedText<32> originator;                  // 256
     FixedText<32> originatorReference;         // 288
-    FixedText<10> originationDate;             // 320  yyyy-mm-dd; other separators stand there too
+    FixedText<10> originationDate;             // 320  yyyy-mm-dd; other separators occur too
     FixedText<8> originationTime;              // 330  hh:mm:ss
     Packed<std::uint32_t> timeReferenceLow;    // 338  see BroadcastExtension::timeReference
     Packed<std::uint32_t> timeReferenceHigh;   // 342

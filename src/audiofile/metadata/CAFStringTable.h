@@ -4,7 +4,7 @@
 #include "audiofile/metadata/Records.h"
 #include "platform/core/Export.h"
 
-/// Where a text stands; 12 bytes.
+/// The position of a text; 12 bytes.
 struct CAFStringEntry {
     Packed<std::uint32_t> id;    // 0
     Packed<std::int64_t> offset; // 4  of its first byte, behind the last entry

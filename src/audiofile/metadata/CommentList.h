@@ -11,7 +11,7 @@
 
 /// A remark.
 struct AIFFComment {
-    /// Seconds from 1904-01-01, of which `timeStamp` counts, to 1970-01-01.
+    /// The seconds from 1904-01-01, the epoch of `timeStamp`, to 1970-01-01.
     static constexpr std::uint32_t kSecondsTo1970 = 2'082'844'800;
 
     std::uint32_t timeStamp = 0; // when it was made; in which time zone the source does not say

@@ -14,7 +14,7 @@ struct CuePoint {
     Packed<FourCC> dataChunkId = fourCC("data"); //  8  of the chunk that holds the point: "data" or "slnt"
     Packed<std::uint32_t> chunkStart;            // 12  0 when there is one "data"
     Packed<std::uint32_t> blockStart;            // 16  0 of linear PCM
-    Packed<std::uint32_t> sampleOffset;          // 20  the frame that the point stands ahead of
+    Packed<std::uint32_t> sampleOffset;          // 20  the frame after the point
 
     /// Turns every number from `order` to the host's order, or back.
     void byteOrder(std::endian order)

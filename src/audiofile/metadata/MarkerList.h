@@ -13,7 +13,7 @@
 /// A point with a name.
 struct AIFFMarker {
     std::int16_t id = 0;        // above 0, of its own within the file
-    std::uint32_t position = 0; // 0 ahead of the first frame, 1 behind it, and so on
+    std::uint32_t position = 0; // 0 is before the first frame, 1 after it, and so on
     std::string name;           // at most 255 bytes; more are not written. Mac OS Roman by the source, UTF-8 by many
     std::byte pad{0};           // behind a name of even length
     friend bool operator==(const AIFFMarker&, const AIFFMarker&) = default;

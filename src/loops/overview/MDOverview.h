@@ -37,7 +37,7 @@ public:
 
 private:
     bool HasRoomAt(long start) const;
-    /// Adds frames whose extremes `fold(frame, frames)` tells: those of `frames` frames from the added frame `frame`
+    /// Adds frames; `fold(frame, frames)` gives the extremes of `frames` frames from the added frame `frame`
     /// on.
     template <class Fold>
     void AddFrames(long start, long frames, Fold fold);

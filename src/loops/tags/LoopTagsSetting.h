@@ -15,9 +15,10 @@
 KT_EXPORT std::optional<LoopTagAssignment> loopTagAssignment(std::string_view name, platform::Value value,
                                                              platform::Error* error = nullptr);
 
-/// What the assignments change in the file, whose tags are `before` (readOwnLoopTags): what is not named stays, to the
-/// byte. Beats make a loop of a file that does not say what it is. None for a file that is neither AIFF nor CAF; where
-/// the container cannot keep a value, or another tag would be lost; and for values that loopTagAssignment would refuse.
+/// What the assignments change in the file, whose tags are `before` (readOwnLoopTags): tags that are not named stay, to
+/// the byte. Beats make a loop of a file that does not say what it is. None for a file that is neither AIFF nor CAF;
+/// where the container cannot keep a value, or another tag would be lost; and for values that loopTagAssignment would
+/// refuse.
 KT_EXPORT std::optional<LoopTagsPlan> planLoopTagAssignments(const LoopTags& before, const platform::URLRef& file,
                                                              std::span<const LoopTagAssignment> assignments,
                                                              platform::Error* error = nullptr);

@@ -12,7 +12,7 @@
 /// Bodies of the chunks, the first of each kind, which is the one that readers take.
 struct RawLoopTags {
     FourCC fileType = 0;             // "AIFF", "caff" or "WAVE"
-    std::optional<Bytes> basic;      // "basc"; in CAF the pairs of texts behind its UUID
+    std::optional<Bytes> basic;      // "basc"; in CAF the pairs of texts after its UUID
     std::optional<Bytes> categories; // "cate"; none in CAF, where they are pairs of `basic`
     std::optional<Bytes> transients; // without a UUID
     std::map<FourCC, Bytes> texts;   // "NAME", "AUTH", "(c) " and "COMT"; in CAF "info"; in WAVE "acid" and "smpl"

@@ -23,5 +23,5 @@ std::vector<std::string> loopTagsLostInWave(const LoopTags& source, const LoopTa
 /// What asLoopChunks says of markers.
 inline constexpr const char* kLoopMarkersAreLost = "markers are not kept";
 /// The tags of a WAVE or AIFC file as loop chunks would hold them, which `tags` then says too: keys in the octave of
-/// loop tags. `notKept` tells what those have no room for.
+/// loop tags. `notKept` lists what those have no room for.
 RawLoopTags asLoopChunks(LoopTags& tags, std::vector<std::string>& notKept);

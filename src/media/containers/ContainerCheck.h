@@ -41,8 +41,8 @@ struct ContainerFinding {
         versionIsMissing,  // AIFC's "FVER"
         offsetIsWrong,     // stated: where AIFF's samples begin in their chunk; found: how many bytes it has
         tableIsShort,      // stated: the entries that a "ds64" counts; found: how many fit in it
-        digestIsWrong,     // found: its size in bytes, which is that of no MD5
-        digestDiffers      // the MD5 that the chunk states is not that of the samples
+        digestIsWrong,     // found: its size in bytes, which no MD5 has
+        digestDiffers      // the samples have another MD5 than the chunk states
     };
 
     Kind kind;                // what is wrong

@@ -1,5 +1,5 @@
-// What the library knows of each container, one table: how a file begins, where chunks stand in it, what they are to
-// the sound, what may be done. Published sources: EA IFF 85, AIFF 1.3 and AIFC, EBU Tech 3306 (RF64), ITU-R BS.2088
+// What the library knows of each container, in one table: how a file begins, where its chunks lie, what they are for,
+// and which edits it allows. Published sources: EA IFF 85, AIFF 1.3 and AIFC, EBU Tech 3306 (RF64), ITU-R BS.2088
 // (BW64), CAF 1.0, the Wave64 file format (2003), the manual page audio(4) of AU.
 #pragma once
 
@@ -23,7 +23,7 @@ enum class ContainerKind : std::uint8_t {
     caf,    // CAF
     rifx,   // RIFF whose numbers and samples are big-endian; only read
     wave64, // only read
-    au,     // only read; a header and samples, which stand for two chunks
+    au,     // only read; its header and its samples count as two chunks
     rex2    // its chunks are known, its sound is not
 };
 
@@ -44,7 +44,7 @@ struct ContainerTraits {
     };
 
     ContainerKind kind;                  // the container
-    FourCC fileType;                     // as hosts know it; of iff that of AIFF
+    FourCC fileType;                     // as hosts know it; "AIFF" for iff
     bool hasChunks;                      // whether ForEachChunk lists its chunks
     bool isEditable;                     // chunks can be added and removed, user data set, samples written
     std::endian order;                   // of numbers in headers

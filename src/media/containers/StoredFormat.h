@@ -31,7 +31,7 @@ struct StoredFormat {
 /// How many bytes of a format chunk are used, at most.
 inline constexpr std::size_t kMostOfStoredFormat = 40;
 
-// Each takes the body of the format chunk, as far as it is there; null when it is too short.
+// Each takes those bytes of the format chunk's body that are there; null when they are too few.
 
 /// The format in "fmt "; in RIFX header and samples are big-endian.
 std::optional<StoredFormat> storedFormatOfWAVE(BytesView format, std::endian order = std::endian::little);

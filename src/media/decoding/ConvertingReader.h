@@ -77,8 +77,8 @@ public:
     /// missing ones silent. Drops the layout.
     ///
     /// Another sample rate needs the decoder module, and on both sides 1 to 768,000 whole hertz and at most 64
-    /// channels. Places and counts of frames are then those of the client's rate. A rate other than before sets the
-    /// place to 0.
+    /// channels. Positions and counts are then frames at the client's rate. A change of rate sets the
+    /// position to 0.
     std::int32_t setClientFormat(const StreamDescription& format, Error* error = nullptr);
     /// What else the file says; channels come in the order of the speakers' bits. Empty for linear PCM that the
     /// library reads itself (CAudioFileIO tells).

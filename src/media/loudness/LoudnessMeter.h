@@ -16,7 +16,7 @@ struct Loudness {
     std::optional<double> integrated;   ///< of all but the quiet parts (gated), in LUFS; of 400 ms at least
     std::optional<double> range;        ///< in LU, by the short-term loudness of each 100 ms; of 3 s at least
     std::optional<double> maxTruePeak;  ///< of all channels, in dBTP
-    std::optional<double> maxMomentary; ///< of any 400 ms, ten of which begin in a second, in LUFS
+    std::optional<double> maxMomentary; ///< of any window of 400 ms, ten windows a second, in LUFS
     std::optional<double> maxShortTerm; ///< of any 3 s, the same way
 };
 

@@ -13,7 +13,7 @@ namespace platform {
 /// What a compressed file holds.
 struct CompressedAudio {
     FourCC fileType = 0;      // "MPG3", "adts", "m4af", "mp4f"; of other files a code of their own
-    StreamDescription format; // rate and channels are those of the frames that decoding gives
+    StreamDescription format; // with the rate and the channels that decoding gives
     std::uint64_t frames = 0; // samples of each channel
     SoundFacts facts;         // what else the file says
 };

@@ -1,4 +1,4 @@
-// Linear PCM samples as they stand in files, to and from 32-bit floats.
+// Conversion of linear PCM samples between their stored form and 32-bit floats.
 #pragma once
 
 #include "platform/core/Export.h"

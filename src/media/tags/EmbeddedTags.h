@@ -18,9 +18,9 @@ namespace platform {
 struct EmbeddedTag {
     static constexpr std::size_t kMaxHead = 64; // bytes of `head`
 
-    std::string system; ///< where it stands: "ID3v1", "ID3v2", "Vorbis comment", "FLAC", "APE", "MP4", "ASF"
-    /// As the system spells it ("TIT2", "©nam", "WM/AlbumTitle"), with what tells entries of one kind apart behind
-    /// colons: "COMM:eng:notes" by language and description, "TXXX:BARCODE" by description, "PRIV:owner".
+    std::string system; ///< the tag system: "ID3v1", "ID3v2", "Vorbis comment", "FLAC", "APE", "MP4", "ASF"
+    /// As the system spells it ("TIT2", "©nam", "WM/AlbumTitle"), followed by a colon and what distinguishes entries
+    /// of one kind: "COMM:eng:notes" by language and description, "TXXX:BARCODE" by description, "PRIV:owner".
     std::string key;
     std::string name;                ///< what programs call it whatever the system ("TITLE"); empty for no common one
     std::vector<std::string> values; ///< in UTF-8

@@ -295,6 +295,15 @@ KTF_API ktf_status ktf_remove_tags(const char* path, const ktf_edit_options* opt
 /// or for want of the module.
 KTF_API ktf_status ktf_each_field(const char* path, ktf_text_function function, void* context);
 
+// ---- ADM -----------------------------------------------------------------------------------------------------------
+
+/// The ADM document (ITU-R BS.2076) of an XML file, or of the chunk "axml" of an audio file, as JSON: an object with
+/// the members of `ktfiles adm --json`, "path" being the path as it was given; times are microseconds. `*text`, with a
+/// NUL behind its `*size` bytes (null where that is not wanted), must go to ktf_free(). KTF_NOT_THERE for an audio file
+/// without one; KTF_NOT_SUPPORTED for what is neither XML nor a container; KTF_FAILED for a document that breaks a
+/// rule.
+KTF_API ktf_status ktf_adm_json(const char* path, char** text, size_t* size);
+
 // ---- Locks ---------------------------------------------------------------------------------------------------------
 
 /// Coordinated access to a file, which holds back other users of this library, in this process and in others of the

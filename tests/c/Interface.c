@@ -466,6 +466,25 @@ static void checkFields(const char* media, const char* notAudio)
     EXPECT_STATUS(ktf_each_field(path, NULL, NULL), KTF_PARAMETER_ERROR);
 }
 
+static void checkDocuments(const char* media, const char* wave)
+{
+    char path[4096];
+    char* text = NULL;
+    size_t size = 1;
+    snprintf(path, sizeof path, "%s/harbour-bw64.wav", media);
+    EXPECT_OK(ktf_adm_json(path, &text, &size));
+    EXPECT(text[0] == '{' && strlen(text) == size && strstr(text, "\"programmes\":") != NULL);
+    ktf_free(text);
+    EXPECT_STATUS(ktf_adm_json(wave, &text, &size), KTF_NOT_THERE);
+    EXPECT(text == NULL && size == 0);
+    snprintf(path, sizeof path, "%s/harbour.xml", media);
+    EXPECT_OK(ktf_adm_json(path, &text, NULL));
+    ktf_free(text);
+    EXPECT_STATUS(ktf_adm_json("nowhere.xml", &text, NULL), KTF_FILE_NOT_FOUND);
+    EXPECT_STATUS(ktf_adm_json(NULL, &text, NULL), KTF_PARAMETER_ERROR);
+    EXPECT_STATUS(ktf_adm_json(path, NULL, NULL), KTF_PARAMETER_ERROR);
+}
+
 static void checkNulls(const char* wave)
 {
     ktf_file* file = NULL;
@@ -582,6 +601,7 @@ int main(int argc, char** argv)
     checkLocks(wave);
     checkTags(argv[1], wave);
     checkFields(argv[1], makeWave("empty.txt", 0));
+    checkDocuments(argv[1], wave);
     checkNulls(wave);
     checkDamaged();
     checkThreads();

@@ -23,7 +23,7 @@ typedef struct CFileRef CFileRef;
 
 /// How audio data is coded, in host order (platform::StreamDescription).
 typedef struct XStreamDescription {
-    double sampleRate;         //  0
+    double sampleRate;         //  0  hertz
     uint32_t formatId;         //  8  "lpcm" for linear PCM
     uint32_t formatFlags;      // 12  bit 0 float, 1 big-endian, 2 signed integer, 3 packed
     uint32_t bytesPerPacket;   //  16  0: packets differ in size
@@ -41,9 +41,9 @@ typedef struct XStreamChannelLayout {
     uint32_t bitmap;           //  4  a bit for each speaker
     uint32_t descriptionCount; //  8  how many descriptions there are
     struct {
-        uint32_t label;       // 12
-        uint32_t flags;       // 16
-        float coordinates[3]; // 20
+        uint32_t label;       // 12  what the channel is
+        uint32_t flags;       // 16  0
+        float coordinates[3]; // 20  where it is, when the label says so
     } descriptions[1];        // as many as `descriptionCount`
 } XStreamChannelLayout;
 
@@ -51,10 +51,10 @@ typedef struct XStreamChannelLayout {
 typedef struct XStreamReadRequest {
     void* link;                            //  0  not used
     int64_t position;                      //  8  first frame
-    uint32_t framesRequested;              // 16
+    uint32_t framesRequested;              // 16  at most so many are read
     uint32_t framesRead;                   // 20  out
     void (*completion)(void* userPointer); // 24  called after a successful read; may be null
-    void* userPointer;                     // 32
+    void* userPointer;                     // 32  passed to `completion`
     void* completionState;                 // 40  null once `completion` has returned
     uint32_t bytesRead;                    // 48  out
     void* buffer;                          // 56  for interleaved frames of the client format, aligned for its samples

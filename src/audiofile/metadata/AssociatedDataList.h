@@ -16,12 +16,12 @@ struct CueText {
 
 /// "ltxt": makes a point a range, and may name it; these 20 bytes, then a text.
 struct CueRangeFields {
-    Packed<std::uint32_t> cueId;        //  0
+    Packed<std::uint32_t> cueId;        //  0  of a point of "cue "
     Packed<std::uint32_t> sampleLength; //  4  in frames
     Packed<FourCC> purpose;             //  8  "rgn ", "mark", "beat", "scrp" (script), "capt" (caption) …
     Packed<std::uint16_t> country;      // 12  as a telephone's country code; 0 none
-    Packed<std::uint16_t> language;     // 14
-    Packed<std::uint16_t> dialect;      // 16
+    Packed<std::uint16_t> language;     // 14  as RIFF numbers languages; 0 none
+    Packed<std::uint16_t> dialect;      // 16  of that language
     Packed<std::uint16_t> codePage;     // 18  of the text
 
     /// Turns every number from `order` to the host's order, or back.

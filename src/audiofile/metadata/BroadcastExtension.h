@@ -11,13 +11,13 @@
 struct BroadcastFields {
     static constexpr std::int16_t kNoLoudness = 0x7FFF; // a value of the five loudness fields: unknown
 
-    FixedText<256> description;                //   0
-    FixedText<32> originator;                  // 256
-    FixedText<32> originatorReference;         // 288
+    FixedText<256> description;                //   0  of the recording, free text
+    FixedText<32> originator;                  // 256  who made the recording
+    FixedText<32> originatorReference;         // 288  the originator's number of the recording
     FixedText<10> originationDate;             // 320  yyyy-mm-dd; other separators occur too
     FixedText<8> originationTime;              // 330  hh:mm:ss
     Packed<std::uint32_t> timeReferenceLow;    // 338  see BroadcastExtension::timeReference
-    Packed<std::uint32_t> timeReferenceHigh;   // 342
+    Packed<std::uint32_t> timeReferenceHigh;   // 342  the upper half
     Packed<std::uint16_t> version;             // 346  0 to 2
     std::array<std::byte, 64> umid{};          // 348  SMPTE ST 330, from version 1 on; of 32 bytes, zeros follow
     Packed<std::int16_t> loudnessValue;        // 412  integrated, 1/100 LUFS; this and the next four from version 2 on
@@ -25,7 +25,7 @@ struct BroadcastFields {
     Packed<std::int16_t> maxTruePeakLevel;     // 416  1/100 dBTP
     Packed<std::int16_t> maxMomentaryLoudness; // 418  1/100 LUFS
     Packed<std::int16_t> maxShortTermLoudness; // 420  1/100 LUFS
-    std::array<std::byte, 180> reserved{};     // 422
+    std::array<std::byte, 180> reserved{};     // 422  zeros; kept as they are
 
     /// Turns every number from `order` to the host's order, or back.
     void byteOrder(std::endian order)

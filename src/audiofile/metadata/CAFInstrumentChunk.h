@@ -15,8 +15,8 @@ struct CAFInstrumentFields {
     Packed<std::uint8_t> highVelocity;   //  7  1 to 127
     Packed<float> gain;                  //  8  dB
     Packed<std::uint32_t> startRegion;   // 12  ids of regions of "regn"; 0xFFFFFFFF none
-    Packed<std::uint32_t> sustainRegion; // 16
-    Packed<std::uint32_t> releaseRegion; // 20
+    Packed<std::uint32_t> sustainRegion; // 16  played while the note is held
+    Packed<std::uint32_t> releaseRegion; // 20  played afterwards
     Packed<std::uint32_t> instrumentId;  // 24  of its text in "strg"
 
     /// Turns every number from `order` to the host's order, or back.

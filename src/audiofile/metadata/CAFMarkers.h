@@ -8,11 +8,11 @@
 
 /// A moment by time code; 8 bytes, all of 0xFF when there is none.
 struct CAFTimecode {
-    Packed<std::int8_t> hours;                  // 0
-    Packed<std::int8_t> minutes;                // 1
-    Packed<std::int8_t> seconds;                // 2
-    Packed<std::int8_t> frames;                 // 3
-    Packed<std::uint32_t> subFrameSampleOffset; // 4
+    Packed<std::int8_t> hours;                  // 0  0 to 23; -1 when there is none
+    Packed<std::int8_t> minutes;                // 1  0 to 59
+    Packed<std::int8_t> seconds;                // 2  0 to 59
+    Packed<std::int8_t> frames;                 // 3  within the second
+    Packed<std::uint32_t> subFrameSampleOffset; // 4  samples after the frame
 
     /// Turns every number from `order` to the host's order, or back.
     void byteOrder(std::endian order) { turnFields(order, subFrameSampleOffset); }
@@ -24,7 +24,7 @@ struct CAFMarker {
     Packed<FourCC> type;           //  0  0 generic, "pbeg" and "pend" program, "rbeg" and "rend" region, "tmpo" …
     Packed<double> framePosition;  //  4  frames, with fractions
     Packed<std::uint32_t> id;      // 12  of its text in "strg"
-    CAFTimecode timecode;          // 16
+    CAFTimecode timecode;          // 16  of the position, if any
     Packed<std::uint32_t> channel; // 24  0 all channels
 
     /// Turns every number from `order` to the host's order, or back.

@@ -6,7 +6,7 @@
 
 /// The position of a text; 12 bytes.
 struct CAFStringEntry {
-    Packed<std::uint32_t> id;    // 0
+    Packed<std::uint32_t> id;    // 0  by which markers, regions and instruments name the text
     Packed<std::int64_t> offset; // 4  of its first byte, behind the last entry
 
     /// Turns every number from `order` to the host's order, or back.

@@ -24,24 +24,24 @@ struct CartTimer {
 /// These members, top to bottom, are the first 2048 bytes of "cart". Texts are ASCII by the source.
 struct CartFields {
     FixedText<4> version;                  //    0  "0101": 1.01
-    FixedText<64> title;                   //    4
-    FixedText<64> artist;                  //   68
-    FixedText<64> cutId;                   //  132
-    FixedText<64> clientId;                //  196
-    FixedText<64> category;                //  260
-    FixedText<64> classification;          //  324
-    FixedText<64> outCue;                  //  388
+    FixedText<64> title;                   //    4  of the cut
+    FixedText<64> artist;                  //   68  of the cut
+    FixedText<64> cutId;                   //  132  the station's number of the cut
+    FixedText<64> clientId;                //  196  of the advertiser
+    FixedText<64> category;                //  260  as the station sorts its cuts
+    FixedText<64> classification;          //  324  within the category
+    FixedText<64> outCue;                  //  388  the last words
     FixedText<10> startDate;               //  452  yyyy-mm-dd
     FixedText<8> startTime;                //  462  hh:mm:ss
-    FixedText<10> endDate;                 //  470
-    FixedText<8> endTime;                  //  480
-    FixedText<64> producerAppId;           //  488
-    FixedText<64> producerAppVersion;      //  552
-    FixedText<64> userDef;                 //  616
+    FixedText<10> endDate;                 //  470  yyyy-mm-dd; after it the cut is not played
+    FixedText<8> endTime;                  //  480  hh:mm:ss
+    FixedText<64> producerAppId;           //  488  the program that made the chunk
+    FixedText<64> producerAppVersion;      //  552  of that program
+    FixedText<64> userDef;                 //  616  the station's own
     Packed<std::int32_t> levelReference;   //  680  the sample value of 0 dB
-    std::array<CartTimer, 8> postTimers;   //  684
-    std::array<std::byte, 276> reserved{}; //  748
-    FixedText<1024> url;                   // 1024
+    std::array<CartTimer, 8> postTimers;   //  684  moments in the cut
+    std::array<std::byte, 276> reserved{}; //  748  zeros; kept as they are
+    FixedText<1024> url;                   // 1024  where to read more
 
     /// Turns every number from `order` to the host's order, or back.
     void byteOrder(std::endian order)

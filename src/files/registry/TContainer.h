@@ -38,7 +38,7 @@ struct TContainerValueCallbacks {
     /// Whether two containers count as one.
     using Equality = bool (*)(const TContainer* a, const TContainer* b);
 
-    int version = 0;                   // 0
+    int version = 0;                   // always 0
     Retain retain = nullptr;           // called with each container that a table takes
     Release release = nullptr;         // called with each container that a table drops
     Description description = nullptr; // none

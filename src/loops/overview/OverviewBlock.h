@@ -22,7 +22,7 @@ static_assert(sizeof(OverviewPoint) == 2);
 /// The header of a block, in host order; the points follow it.
 struct OverviewHeader {
     std::uint32_t frames = 0;   // 2^32 - 1 for as many and more
-    std::uint32_t reserved = 0; // 0
+    std::uint32_t reserved = 0; // always 0
 };
 static_assert(sizeof(OverviewHeader) == kOverviewHeaderSize);
 

@@ -33,9 +33,9 @@ inline constexpr std::int32_t kChunkSizeTooLarge = -9;
 
 /// The 12 bytes at the start of a container.
 struct KT_EXPORT ContainerChk {
-    Packed<FourCC> id;          //  0
+    Packed<FourCC> id;          //  0  of the container or the chunk
     Packed<std::uint32_t> size; //  4  bytes from offset 8 to the end of the container
-    Packed<FourCC> formType;    //  8
+    Packed<FourCC> formType;    //  8  "WAVE", "AIFF", "AIFC"
 
     /// Unsigned for "WAVE", signed otherwise.
     std::int64_t Size() const;
@@ -48,8 +48,8 @@ static_assert(sizeof(ContainerChk) == 12);
 
 /// One entry of the "ds64" table.
 struct Ds64TableEntry {
-    Packed<FourCC> id;          // 0
-    Packed<std::uint64_t> size; // 4
+    Packed<FourCC> id;          // 0  of the container or the chunk
+    Packed<std::uint64_t> size; // 4  of the body, in bytes
 };
 static_assert(sizeof(Ds64TableEntry) == 12);
 
@@ -60,16 +60,16 @@ struct KT_EXPORT ContainerChkExtended {
     static constexpr std::size_t kHeadersSize = 20;   // container header and first chunk header
     static constexpr std::size_t kDs64FixedSize = 28; // the "ds64" body ahead of its table
 
-    Packed<FourCC> id;                                //  0
+    Packed<FourCC> id;                                //  0  of the container or the chunk
     Packed<std::uint32_t> size;                       //  4  0xFFFFFFFF: see riffSize
-    Packed<FourCC> formType;                          //  8
-    Packed<FourCC> firstChunkId;                      // 12
-    Packed<std::uint32_t> firstChunkSize;             // 16
-    Packed<std::uint64_t> riffSize;                   // 20
-    Packed<std::uint64_t> dataSize;                   // 28
+    Packed<FourCC> formType;                          //  8  "WAVE", "AIFF", "AIFC"
+    Packed<FourCC> firstChunkId;                      // 12  "ds64", "JUNK" or another
+    Packed<std::uint32_t> firstChunkSize;             // 16  as stored, in bytes
+    Packed<std::uint64_t> riffSize;                   // 20  counts when `size` is 0xFFFFFFFF
+    Packed<std::uint64_t> dataSize;                   // 28  of the body of "data", counts when its size is 0xFFFFFFFF
     Packed<std::uint64_t> sampleCount;                // 36  carried, not interpreted
-    Packed<std::uint32_t> tableLength;                // 44
-    std::array<Ds64TableEntry, kTableCapacity> table; // 48
+    Packed<std::uint32_t> tableLength;                // 44  entries that the file has
+    std::array<Ds64TableEntry, kTableCapacity> table; // 48  sizes of other large chunks
 
     /// Whether the form is "WAVE".
     bool IsWAVE() const { return formType == kWAVE; }
@@ -92,7 +92,7 @@ static_assert(offsetof(ContainerChkExtended, riffSize) == 20 && offsetof(Contain
 
 /// The 8 bytes ahead of each chunk's body.
 struct KT_EXPORT ChkHeader {
-    Packed<FourCC> id;          // 0
+    Packed<FourCC> id;          // 0  of the container or the chunk
     Packed<std::uint32_t> size; // 4  0xFFFFFFFF: see the "ds64"
 
     /// The size of the body; negative for an AIFF size of 2^31 or more.
@@ -106,7 +106,7 @@ static_assert(sizeof(ChkHeader) == 8);
 
 /// The 12 bytes ahead of each chunk of a CAF file, big-endian (published format description, version 1.0).
 struct CAFChunkHeader {
-    Packed<FourCC> id;         // 0
+    Packed<FourCC> id;         // 0  of the container or the chunk
     Packed<std::int64_t> size; // 4  -1: to the end of the file, for the last chunk, "data"
 };
 static_assert(sizeof(CAFChunkHeader) == 12);

@@ -34,7 +34,7 @@ struct ChannelLayout {
     /// One channel.
     struct Description {
         std::uint32_t label = 0;   // what the channel is
-        std::uint32_t flags = 0;   // 0
+        std::uint32_t flags = 0;   // always 0
         float coordinates[3] = {}; // where it is, when the label says so
     };
 

@@ -22,7 +22,7 @@ struct KT_EXPORT StreamDescription {
     std::uint32_t bytesPerFrame = 0;    // 0 for compressed data
     std::uint32_t channelsPerFrame = 0; // interleaved
     std::uint32_t bitsPerChannel = 0;   // 0 for compressed data
-    std::uint32_t reserved = 0;         // 0
+    std::uint32_t reserved = 0;         // always 0
 
     /// Whether the data is linear PCM.
     bool isLinearPCM() const { return formatId == linearPCM; }

@@ -9,7 +9,7 @@ namespace py = pybind11;
 
 namespace {
 
-constexpr std::array<std::pair<std::int32_t, int>, 14> kSystemErrors{{
+constexpr std::array<std::pair<std::int32_t, int>, 13> kSystemErrors{{
     {kStatusInterrupted, EINTR},
     {kStatusDiskFull, ENOSPC},
     {kStatusIOError, EIO},
@@ -19,7 +19,6 @@ constexpr std::array<std::pair<std::int32_t, int>, 14> kSystemErrors{{
     {kStatusFileBusy, EBUSY},
     {kStatusDuplicateName, EEXIST},
     {kStatusWritePermission, EROFS},
-    {kStatusNotAFile, EISDIR},
     {kStatusFileTooBig, EFBIG},
     {kStatusNotAFolder, ENOTDIR},
     {kStatusQuotaExceeded, EDQUOT},

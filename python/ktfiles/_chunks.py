@@ -108,7 +108,7 @@ class Chunks(MutableMapping):  # type: ignore[type-arg]
         """
         return (
             _core.add_chunk(
-                self._path, _code(chunk_id), data, replace, force, in_place, backup, keep_times, timeout
+                self._path, _code(chunk_id), memoryview(data), replace, force, in_place, backup, keep_times, timeout
             )
             or None
         )

@@ -44,6 +44,8 @@ class TimedOutError(Error, TimeoutError):
 for _kind in (Error, NotFoundError, AccessError, FolderError, NoFolderError, TimedOutError):
     _kind.__module__ = "ktfiles"  # as callers name them
 
+_PARAMETER_ERROR = -50  # among others, of a folder where a file is needed
+
 _KINDS: Dict[int, Type[Error]] = {
     _errno.ENOENT: NotFoundError,
     _errno.EACCES: AccessError,
@@ -56,6 +58,8 @@ _KINDS: Dict[int, Type[Error]] = {
 
 def make(status: int, errno: int, text: str, path: bytes) -> Error:
     """The exception for a problem of the compiled part."""
+    if status == _PARAMETER_ERROR and os.path.isdir(path):
+        errno, text = _errno.EISDIR, os.strerror(_errno.EISDIR)
     filename: Optional[str] = os.fsdecode(path)
     error = _KINDS.get(errno, Error)(errno or None, text, filename)
     error.status = status

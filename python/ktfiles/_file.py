@@ -15,6 +15,7 @@ if TYPE_CHECKING:
     import numpy as np
     import numpy.typing as npt
 
+_MOST_CHANNELS = 1024
 _THREADS = 4
 
 
@@ -35,8 +36,8 @@ class AudioFile:
     ) -> None:
         if sample_rate is not None and not sample_rate > 0:
             raise ValueError("sample_rate is not positive")
-        if channels is not None and channels < 1:
-            raise ValueError("channels is not positive")
+        if channels is not None and not 1 <= channels <= _MOST_CHANNELS:
+            raise ValueError(f"channels is not 1 to {_MOST_CHANNELS}")
         if threads is not None and threads < 1:
             raise ValueError("threads is not positive")
         given = encoded(path)

@@ -244,3 +244,16 @@ def test_paths_of_every_kind(sound, tmp_path, monkeypatch):
     with pytest.raises(ktfiles.NotFoundError) as caught:
         ktfiles.open(str(odd) + "x")
     assert caught.value.filename == str(odd) + "x"
+
+
+def test_a_folder_is_told_as_one(tmp_path, sound):
+    for read in ktfiles.open, ktfiles.meta, ktfiles.overview, ktfiles.adm, lambda path: ktfiles.chunks(path).list():
+        with pytest.raises(IsADirectoryError) as caught:
+            read(tmp_path)
+        assert (caught.value.filename, caught.value.status) == (str(tmp_path), -50)
+    with pytest.raises(ktfiles.Error) as caught:
+        ktfiles.open("/dev/null")
+    assert not isinstance(caught.value, IsADirectoryError) and caught.value.strerror == "not a file"
+    for channels in 0, 2**40:
+        with pytest.raises(ValueError):
+            ktfiles.open(sound("a.wav"), channels=channels)

@@ -33,10 +33,11 @@ std::string rateText(const AudioFileInfo& info)
 std::string channelsText(const AudioFileInfo& info)
 {
     const std::string layout = layoutWord(info);
-    return !layout.empty()      ? layout
-           : info.channels == 1 ? "mono"
-           : info.channels == 2 ? "stereo"
-                                : fmt::format("{} channels", info.channels);
+    if (!layout.empty())
+        return layout;
+    if (info.channels == 1)
+        return "mono";
+    return info.channels == 2 ? "stereo" : fmt::format("{} channels", info.channels);
 }
 
 std::string tracksText(const AudioFileInfo& info)

@@ -142,11 +142,14 @@ std::string XMLText::escaped(std::string_view value, bool isAttribute) const
         value.remove_prefix(1);
         if (static_cast<unsigned char>(c) < 0x20 && kXMLBlanks.find(c) == std::string_view::npos)
             throw Failure("XML has no control characters");
-        if (c == '&' || c == '<' || c == '>' || c == '\r' || (isAttribute && (c == '"' || c == '\n' || c == '\t')))
-            text += c == '&'   ? "&amp;"
-                    : c == '<' ? "&lt;"
-                    : c == '>' ? "&gt;"
-                               : fmt::format("&#{};", static_cast<int>(c));
+        if (c == '&')
+            text += "&amp;";
+        else if (c == '<')
+            text += "&lt;";
+        else if (c == '>')
+            text += "&gt;";
+        else if (c == '\r' || (isAttribute && (c == '"' || c == '\n' || c == '\t')))
+            text += fmt::format("&#{};", static_cast<int>(c));
         else
             text += c;
     }

@@ -17,9 +17,10 @@ std::map<std::string, std::string, std::less<>> loopTagSources(const LoopTags& t
     for (const LoopTagValue& tag : loopTagValues(tags)) {
         const auto* const text = std::ranges::find(texts, tag.name, [](const auto& each) { return each.first; });
         const bool isInCategories = std::ranges::find(inCategories, tag.name) != std::end(inCategories);
-        sources.try_emplace(tag.name, text != std::end(texts)    ? isAIFF ? text->second : "info"
-                                      : isAIFF && isInCategories ? "cate"
-                                                                 : "basc");
+        const char* source = isAIFF && isInCategories ? "cate" : "basc";
+        if (text != std::end(texts))
+            source = isAIFF ? text->second : "info";
+        sources.try_emplace(tag.name, source);
     }
     if (!tags.transients.empty())
         sources.emplace("transients", "trns");

@@ -130,12 +130,14 @@ Bytes headerOfWAVE(const NewContainer& file)
 /// Writes the compression type and its name as a counted text, padded to an even length.
 void writeCompression(ByteWriter& out, const NewContainer& file)
 {
-    const bool isDouble = file.format.bitsPerChannel == 64;
-    const bool isBigEndian = (file.format.formatFlags & Flag::isBigEndian) != 0;
-    const std::string_view name = !isFloat(file) ? "" : isDouble ? "64-bit floating point" : "32-bit floating point";
-    out.writeFourCC(isFloat(file) ? isDouble ? fourCC("fl64") : fourCC("fl32")
-                    : isBigEndian ? fourCC("NONE")
-                                  : fourCC("sowt"));
+    FourCC type = (file.format.formatFlags & Flag::isBigEndian) != 0 ? fourCC("NONE") : fourCC("sowt");
+    std::string_view name;
+    if (isFloat(file)) {
+        const bool isDouble = file.format.bitsPerChannel == 64;
+        type = isDouble ? fourCC("fl64") : fourCC("fl32");
+        name = isDouble ? "64-bit floating point" : "32-bit floating point";
+    }
+    out.writeFourCC(type);
     out.write(static_cast<std::uint8_t>(name.size()));
     out.write(bytesOf(name));
     if (name.size() % 2 == 0)

@@ -101,11 +101,16 @@ bool FFmpegCodec::decodesDSD() const
 
 Codec::Result FFmpegCodec::receive()
 {
-    const int result = avcodec_receive_frame(context_.get(), frame_.get());
-    return result == 0                 ? Result::frame
-           : result == AVERROR(EAGAIN) ? Result::needsPacket
-           : result == AVERROR_EOF     ? Result::end
-                                       : Result::failed;
+    switch (avcodec_receive_frame(context_.get(), frame_.get())) {
+    case 0:
+        return Result::frame;
+    case AVERROR(EAGAIN):
+        return Result::needsPacket;
+    case AVERROR_EOF:
+        return Result::end;
+    default:
+        return Result::failed;
+    }
 }
 
 Codec::Sent FFmpegCodec::send(const AVPacket* packet)

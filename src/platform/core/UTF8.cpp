@@ -1,7 +1,7 @@
 #include "platform/core/UTF8.h"
 
 #include <algorithm>
-#include <cstddef>
+#include <bit>
 #include <iterator>
 #include <utility>
 
@@ -11,29 +11,55 @@ namespace {
 
 constexpr char32_t kReplacement = 0xFFFD;
 
+/// The values that a byte after the first one of a character may have.
+struct ContinuationBytes {
+    unsigned least = 0x80, most = 0xBF;
+};
+
+/// Those of a second byte: fewer than of later ones, so that no character has two forms, and none is a surrogate or
+/// beyond U+10FFFF.
+ContinuationBytes secondBytesAfter(unsigned lead)
+{
+    switch (lead) {
+    case 0xE0:
+        return {.least = 0xA0};
+    case 0xED:
+        return {.most = 0x9F};
+    case 0xF0:
+        return {.least = 0x90};
+    case 0xF4:
+        return {.most = 0x8F};
+    default:
+        return {};
+    }
+}
+
+/// The rest of a character that begins with `lead`, which is no ASCII.
+char32_t takeContinuation(unsigned lead, std::string_view& text)
+{
+    if (lead < 0xC2 || lead > 0xF4)
+        return kReplacement;
+    const int length = std::countl_one(static_cast<unsigned char>(lead));
+    char32_t code = lead & (0x7FU >> length);
+    ContinuationBytes allowed = secondBytesAfter(lead);
+    for (int i = 1; i < length; ++i) {
+        const unsigned byte = text.empty() ? 0U : static_cast<unsigned char>(text[0]);
+        if (byte < allowed.least || byte > allowed.most)
+            return kReplacement;
+        code = code << 6 | (byte & 0x3FU);
+        text.remove_prefix(1);
+        allowed = {};
+    }
+    return code;
+}
+
 } // namespace
 
 char32_t takeCharacter(std::string_view& text)
 {
-    const std::string_view whole = text;
-    const auto byteAt = [whole](std::size_t i) { return static_cast<unsigned char>(whole[i]); };
-    const unsigned lead = byteAt(0);
+    const unsigned lead = static_cast<unsigned char>(text[0]);
     text.remove_prefix(1);
-    if (lead < 0x80)
-        return lead;
-    if (lead < 0xC2 || lead > 0xF4)
-        return kReplacement;
-    const std::size_t length = lead < 0xE0 ? 2 : lead < 0xF0 ? 3 : 4;
-    char32_t code = lead & (0x7FU >> length);
-    for (std::size_t i = 1; i < length; ++i) {
-        const unsigned least = i > 1 ? 0x80 : lead == 0xE0 ? 0xA0 : lead == 0xF0 ? 0x90 : 0x80;
-        const unsigned most = i > 1 ? 0xBF : lead == 0xED ? 0x9F : lead == 0xF4 ? 0x8F : 0xBF;
-        if (i == whole.size() || byteAt(i) < least || byteAt(i) > most)
-            return kReplacement;
-        code = code << 6 | (byteAt(i) & 0x3FU);
-        text.remove_prefix(1);
-    }
-    return code;
+    return lead < 0x80 ? lead : takeContinuation(lead, text);
 }
 
 bool isLateControl(char32_t character)

@@ -107,12 +107,13 @@ std::optional<std::int64_t> numberOf(const LoopTagField& field, std::string_view
 
 std::string expectedOf(const LoopTagField& field)
 {
-    const std::string_view name = field.name;
-    const std::string words = name == "midiRootNote"   ? "a note such as C, F# or Bb, or "
-                              : name == "keyType"      ? "none, minor, major, neither or both, or "
-                              : name == "loopFileType" ? "loop or \"not a loop\", or "
-                                                       : "";
-    return fmt::format("{}a whole number from {} to {}", words, field.least, field.most);
+    constexpr std::pair<std::string_view, std::string_view> words[] = {
+        {"midiRootNote", "a note such as C, F# or Bb, or "},
+        {"keyType", "none, minor, major, neither or both, or "},
+        {"loopFileType", "loop or \"not a loop\", or "}};
+    const auto* const found = std::ranges::find(words, field.name, [](const auto& each) { return each.first; });
+    return fmt::format("{}a whole number from {} to {}", found != std::end(words) ? found->second : "", field.least,
+                       field.most);
 }
 
 Value numberValue(const LoopTagField& field, std::string_view key, std::string_view text)

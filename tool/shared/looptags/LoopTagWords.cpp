@@ -19,9 +19,16 @@ std::string noteName(std::int64_t note)
     return name.empty() ? std::to_string(note) : std::string(name);
 }
 
-// "minor", "major"; otherwise the number.
+// "minor", "major" and others; empty for 0, the number for one without a name.
 std::string modeName(std::int64_t keyType)
 {
+    constexpr std::int64_t none = 0, neither = 3, both = 4;
+    if (keyType == none)
+        return "";
+    if (keyType == neither)
+        return "neither major nor minor";
+    if (keyType == both)
+        return "major and minor";
     const std::string_view name = VireoLoopModeName(keyType);
     return name.empty() ? std::to_string(keyType) : std::string(name);
 }
@@ -29,11 +36,7 @@ std::string modeName(std::int64_t keyType)
 std::string keyText(const LoopTags& tags)
 {
     const std::int64_t note = tags.number(VireoLoopCombinedTagsChunkDataMidiRootNoteKey);
-    const std::int64_t type = tags.number(VireoLoopCombinedTagsChunkDataKeyType);
-    std::string mode = type == 0   ? ""
-                       : type == 3 ? "neither major nor minor"
-                       : type == 4 ? "major and minor"
-                                   : modeName(type);
+    const std::string mode = modeName(tags.number(VireoLoopCombinedTagsChunkDataKeyType));
     if (note == 0)
         return mode;
     return noteName(note) + (mode.empty() ? "" : " " + mode);

@@ -35,11 +35,15 @@ Bytes newChunk(std::size_t size)
 
 std::size_t offsetInBasic(std::string_view key)
 {
-    return key == kRootNote  ? offsetof(BasicTaggingChunk, midiRootNote)
-           : key == kKeyType ? offsetof(BasicTaggingChunk, keyType)
-           : key == kTop     ? offsetof(BasicTaggingChunk, signatureTop)
-           : key == kBottom  ? offsetof(BasicTaggingChunk, signatureBottom)
-                             : offsetof(BasicTaggingChunk, fileType);
+    if (key == kRootNote)
+        return offsetof(BasicTaggingChunk, midiRootNote);
+    if (key == kKeyType)
+        return offsetof(BasicTaggingChunk, keyType);
+    if (key == kTop)
+        return offsetof(BasicTaggingChunk, signatureTop);
+    if (key == kBottom)
+        return offsetof(BasicTaggingChunk, signatureBottom);
+    return offsetof(BasicTaggingChunk, fileType);
 }
 
 // "its chunk "basc" is cut short (80 of 82 bytes); tags remove takes it off".

@@ -7,7 +7,7 @@
 
 namespace {
 
-constexpr std::size_t kShort = 256; // what is longer need not go in one piece
+constexpr std::size_t kShort = 256; // longer texts may be written in several pieces
 
 constexpr std::uint64_t eight(unsigned char c)
 {
@@ -20,7 +20,7 @@ constexpr bool anyBelow(std::uint64_t bytes, unsigned char c)
     return ((bytes - eight(c)) & eight(0x80)) != 0;
 }
 
-/// Whether it can stand in JSON as it is: printable ASCII, but for the quotation mark and the backslash.
+/// Whether the text needs no escapes: printable ASCII without quotation marks and backslashes.
 bool isPlain(std::string_view text)
 {
     for (std::size_t i = 0; i < text.size(); i += sizeof(std::uint64_t)) {
@@ -109,7 +109,7 @@ JsonWriter& JsonWriter::write(double value)
 {
     if (!std::isfinite(value))
         return writeNull();
-    constexpr double kLeast = 1e-4, kMost = 1e15; // others have an exponent
+    constexpr double kLeast = 1e-4, kMost = 1e15; // outside this range, numbers have an exponent
     const double size = std::fabs(value);
     const bool isFixed = size == 0 || (size >= kLeast && size < kMost);
     char text[40];

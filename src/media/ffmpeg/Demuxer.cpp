@@ -7,6 +7,7 @@
 #include <algorithm>
 #include <cstddef>
 #include <new>
+#include <span>
 #include <vector>
 
 extern "C" {
@@ -89,6 +90,7 @@ Demuxer::Demuxer(const char* path, std::int32_t& status) : url_(std::string("fil
 std::int32_t Demuxer::open()
 {
     context_.reset();
+    frames_.reset();
     FormatContext made(makeSilentContext());
     AVDictionary* options = nullptr;
     if (av_dict_set(&options, "protocol_whitelist", "file", 0) < 0 ||
@@ -100,6 +102,7 @@ std::int32_t Demuxer::open()
     if (result < 0)
         return statusOf(result);
     FormatContext opened(context);
+    const std::int64_t begin = opened->pb != nullptr ? avio_tell(opened->pb) : -1;
     if (!isCredible(*opened, url_))
         return AudioHandle::kFormatNotSupported;
     result = findStreamInfo(*opened);
@@ -112,6 +115,11 @@ std::int32_t Demuxer::open()
         if (static_cast<int>(i) != stream_)
             opened->streams[i]->discard = AVDISCARD_ALL;
     context_ = std::move(opened);
+    const AVCodecParameters& parameters = *stream().codecpar;
+    const bool countsSamples = stream().time_base.num == 1 && stream().time_base.den == parameters.sample_rate;
+    if (name() == "flac" && countsSamples && parameters.extradata != nullptr)
+        frames_ = FLACFrames::from(
+            begin, std::span(parameters.extradata, static_cast<std::size_t>(parameters.extradata_size)));
     return kStatusOK;
 }
 
@@ -144,10 +152,31 @@ std::string_view Demuxer::brand() const
     return entry != nullptr ? entry->value : std::string_view{};
 }
 
+/// Where frames stop FFmpeg goes on: from there, or if that place is not found from the start.
+std::int32_t Demuxer::leaveFrames()
+{
+    const std::int64_t next = frames_->next();
+    if (seek(next))
+        return kStatusOK;
+    const std::int32_t status = restart();
+    frames_.reset();
+    return status;
+}
+
 bool Demuxer::read(AVPacket& packet, std::int32_t& status)
 {
     status = kStatusOK;
-    for (int failures = 0; failures < 100;) {
+    if (frames_) {
+        const FLACFrames::Result result = frames_->read(*context_->pb, packet);
+        packet.stream_index = stream_;
+        if (result == FLACFrames::Result::packet)
+            return true;
+        if (result == FLACFrames::Result::stopped)
+            status = leaveFrames();
+        if (status != kStatusOK)
+            return false;
+    }
+    for (int failures = 0; failures < 100 && !frames_;) {
         const int result = av_read_frame(context_.get(), &packet);
         if (result >= 0 && packet.stream_index == stream_ && packet.size > 0)
             return true;
@@ -166,6 +195,7 @@ bool Demuxer::read(AVPacket& packet, std::int32_t& status)
 
 bool Demuxer::seek(std::int64_t time)
 {
+    frames_.reset();
     return av_seek_frame(context_.get(), stream_, time, AVSEEK_FLAG_BACKWARD) >= 0;
 }
 

@@ -1,10 +1,12 @@
 // The packets of a file's audio, as FFmpeg finds them.
 #pragma once
 
+#include "media/ffmpeg/FLACFrames.h"
 #include "media/ffmpeg/Handles.h"
 
 #include <cstddef>
 #include <cstdint>
+#include <optional>
 #include <string>
 #include <string_view>
 
@@ -41,10 +43,12 @@ public:
 
 private:
     std::int32_t open();
+    std::int32_t leaveFrames();
 
     std::string url_;
     FormatContext context_;
     int stream_ = -1;
+    std::optional<FLACFrames> frames_; // of a FLAC file, from its start to where they stop or something is sought
 };
 
 } // namespace platform::ffmpeg

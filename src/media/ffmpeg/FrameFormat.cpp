@@ -4,6 +4,7 @@
 #include <array>
 #include <bit>
 #include <cstring>
+#include <type_traits>
 
 extern "C" {
 #include <libavcodec/avcodec.h>
@@ -43,6 +44,23 @@ void copyChannel(const From* from, std::size_t step, To* to, std::size_t channel
         to[i * channels] = sampleOf<To>(from[i * step]);
 }
 
+/// Both samples of a frame by one store, of which two bytes are the next frame's to replace.
+void copyStereo(const std::int32_t* left, const std::int32_t* right, Int24* to, std::size_t count)
+{
+    const auto both = [&](std::size_t i) {
+        const auto low = static_cast<std::uint32_t>(left[i]) >> 8, high = static_cast<std::uint32_t>(right[i]) >> 8;
+        return low | std::uint64_t{high} << 24;
+    };
+    for (std::size_t i = 0; i + 1 < count; ++i, to += 2) {
+        const std::uint64_t frame = both(i);
+        std::memcpy(to, &frame, sizeof frame);
+    }
+    if (count > 0) {
+        const std::uint64_t frame = both(count - 1);
+        std::memcpy(to, &frame, 2 * sizeof(Int24));
+    }
+}
+
 template <class From, class To>
 void copyFrames(const AVFrame& frame, std::uint64_t first, std::size_t count, std::size_t channels, std::byte* to)
 {
@@ -55,6 +73,8 @@ void copyFrames(const AVFrame& frame, std::uint64_t first, std::size_t count, st
     };
     if (isPlanar && have == 2 && channels == 2) { // one pass over the most common kind
         const From *left = channel(0), *right = channel(1);
+        if constexpr (std::is_same_v<To, Int24> && std::endian::native == std::endian::little)
+            return copyStereo(left, right, samples, count);
         for (std::size_t i = 0; i < count; ++i) {
             samples[2 * i] = sampleOf<To>(left[i]);
             samples[2 * i + 1] = sampleOf<To>(right[i]);

@@ -2,6 +2,7 @@
 #pragma once
 
 #include "media/containers/HeaderWindow.h"
+#include "media/packets/FLACFrame.h"
 #include "media/samples/StreamDescription.h"
 #include "platform/core/Bytes.h"
 
@@ -32,18 +33,6 @@ FLACProperties readFLACProperties(BytesView bytes);
 
 /// The usual speakers of 1 to 8 channels, which a comment may override.
 std::uint32_t usualSpeakersOfFLAC(std::uint32_t channels);
-
-struct FLACFrame {
-    std::uint64_t first = 0; // number of its first sample
-    std::uint32_t samples = 0;
-    // Rate and bits are 0 if the frame leaves them to STREAMINFO.
-    std::uint32_t sampleRate = 0;
-    std::uint32_t channels = 0;
-    std::uint32_t bits = 0;
-};
-/// Parses the header that the bytes begin with (RFC 9639, 9.1), and compares its checksum; none if there is no valid
-/// header.
-std::optional<FLACFrame> parseFLACFrame(BytesView bytes, std::uint32_t blockSize);
 
 /// Reads a file that begins with "fLaC". kStatusEndOfFile if it ends inside its header, or the status of a failed read.
 std::int32_t readFLACInfo(HeaderWindow& file, FLACInfo& info);

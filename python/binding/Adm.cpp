@@ -8,7 +8,7 @@
 #include "binding/Values.h"
 
 #include "adm/ADMDocument.h"
-#include "audiofile/CAudioFileIO.h"
+#include "adm/files/ADMSource.h"
 
 #include <pybind11/stl.h>
 
@@ -171,31 +171,6 @@ py::list listOf(const ADMElementTable<Element>& elements)
     return made;
 }
 
-/// The chunk "axml" of a container, else the whole file.
-Bytes documentOf(const std::string& path)
-{
-    CAudioFileIO file;
-    require(path, file.OpenForChunks(referenceTo(path), 0));
-    std::int64_t begin = 0, size = file.GetEOF();
-    if (file.HasChunks()) {
-        ChunkEntry chunk;
-        const std::int32_t found = file.LocateChunk(fourCC("axml"), chunk);
-        if (found < 0)
-            require(path, found);
-        if (found == 0)
-            throw Problem(path, kStatusParameterError, "has no chunk \"axml\"");
-        begin = chunk.body;
-        if (chunk.size < 0 || chunk.size > size - begin)
-            throw Problem(path, kStatusEndOfFile, "its chunk \"axml\" is not all there");
-        size = chunk.size;
-    }
-    Bytes bytes(static_cast<std::size_t>(size));
-    require(path, file.Read(bytes.data(), begin, static_cast<long>(size), nullptr));
-    while (!bytes.empty() && bytes.back() == std::byte{0})
-        bytes.pop_back(); // writers pad so
-    return bytes;
-}
-
 std::string textOf(const ADMDiagnostic& diagnostic)
 {
     const std::string text = diagnostic.kind + ": " + diagnostic.text;
@@ -204,10 +179,11 @@ std::string textOf(const ADMDiagnostic& diagnostic)
 
 std::unique_ptr<ADMDocument> parse(const std::string& path, bool isLenient)
 {
-    Bytes bytes = documentOf(path);
-    if (bytes.empty())
-        throw Problem(path, kStatusEndOfFile, "is empty");
-    std::unique_ptr<ADMDocument> document = ADMDocument::initWithADMData(std::move(bytes));
+    platform::Error error;
+    const auto source = ADMSource::open(referenceTo(path), ADMSource::Document::isThere, &error);
+    if (!source)
+        throwProblem(path, error);
+    auto document = std::make_unique<ADMDocument>(nullptr);
     document->setOptions({isLenient, isLenient, isLenient, isLenient});
     std::optional<ADMDiagnostic> last;
     document->setDiagnosticsHandler([&](const ADMDiagnostic& told) { last = told; });
@@ -221,9 +197,10 @@ std::unique_ptr<ADMDocument> parse(const std::string& path, bool isLenient)
             return false;
         }
     });
+    const auto stream = source->stream();
     bool isComplete = false;
     try {
-        isComplete = document->parse();
+        isComplete = document->parseStream(*stream);
     } catch (const ADMException&) {
         // The handler has heard of it, and with its place.
     }

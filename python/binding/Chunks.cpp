@@ -61,7 +61,7 @@ py::object readChunk(const std::string& path, FourCC id)
     PyObject* const made = PyBytes_FromStringAndSize(nullptr, chunk->size); // not filled
     if (made == nullptr)
         throw py::error_already_set();
-    const auto bytes = py::reinterpret_steal<py::bytes>(made);
+    auto bytes = py::reinterpret_steal<py::bytes>(made);
     char* const to = PyBytes_AS_STRING(made);
     {
         const Unlocked unlocked;

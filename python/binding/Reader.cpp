@@ -7,6 +7,7 @@
 #include <pybind11/stl.h>
 
 #include <algorithm>
+#include <atomic>
 #include <limits>
 #include <memory>
 #include <mutex>
@@ -55,14 +56,10 @@ public:
     {
         const Unlocked unlocked;
         const std::lock_guard lock(mutex_);
+        isClosed_ = true;
         readers_.reset();
     }
-    bool isClosed()
-    {
-        const Unlocked unlocked;
-        const std::lock_guard lock(mutex_);
-        return readers_ == nullptr;
-    }
+    bool isClosed() const { return isClosed_; }
     std::uint64_t missingFrames()
     {
         const Unlocked unlocked;
@@ -90,6 +87,7 @@ private:
         return *readers_;
     }
 
+    std::atomic<bool> isClosed_ = false;
     std::mutex mutex_; // taken without the interpreter's lock only
     std::unique_ptr<SoundReaders> readers_;
     platform::StreamDescription file_, client_;

@@ -64,11 +64,12 @@ py::list listOf(const std::vector<SamplerTags::Marker>& markers)
 
 py::list listOf(const std::vector<VireoLoopTransient>& transients)
 {
+    const py::handle type = keyFrom("type"), frame = keyFrom("frame"); // once: there may be millions
     py::list made;
     for (const VireoLoopTransient& transient : transients) {
         py::dict one;
-        one[keyFrom("type")] = transient.transientType();
-        one[keyFrom("frame")] = transient.frame();
+        one[type] = transient.transientType();
+        one[frame] = transient.frame();
         made.append(std::move(one));
     }
     return made;

@@ -45,7 +45,7 @@ def _text(code: int) -> str:
     )
 
 
-class Chunks(MutableMapping):  # type: ignore[type-arg]
+class Chunks(MutableMapping[str, bytes]):
     """The chunks of a WAVE, RF64, BW64, RIFX, Wave64, AIFF, AIFC or CAF file: their bytes by their ids.
 
     Of several chunks of one id the mapping shows one, the last (in CAF the first); `list()` tells of all. Every question

@@ -16,7 +16,6 @@ if TYPE_CHECKING:
     import numpy.typing as npt
 
 _MOST_CHANNELS = 1024
-_THREADS = 4
 
 
 class AudioFile:
@@ -32,19 +31,20 @@ class AudioFile:
         *,
         sample_rate: Optional[float] = None,
         channels: Optional[int] = None,
-        threads: Optional[int] = None,
+        threads: int = 1,
     ) -> None:
         if sample_rate is not None and not sample_rate > 0:
             raise ValueError("sample_rate is not positive")
         if channels is not None and not 1 <= channels <= _MOST_CHANNELS:
             raise ValueError(f"channels is not 1 to {_MOST_CHANNELS}")
-        if threads is not None and threads < 1:
+        if threads < 1:
             raise ValueError("threads is not positive")
         given = encoded(path)
-        self._path = os.path.join(os.getcwdb(), given) if given else given  # wherever the process goes later
+        # Wherever the process goes later.
+        self._path = given if given.startswith(b"/") or not given else os.path.join(os.getcwdb(), given)
         self.name: Path = path
         """The path as it was given."""
-        self._reader = _core.Reader(given, sample_rate, channels, _THREADS if threads is None else threads)
+        self._reader = _core.Reader(given, sample_rate, channels, threads)
         self._info: Optional[Dict[str, Any]] = None
 
     @property
@@ -177,12 +177,12 @@ def open(
     *,
     sample_rate: Optional[float] = None,
     channels: Optional[int] = None,
-    threads: Optional[int] = None,
+    threads: int = 1,
 ) -> AudioFile:
     """Opens a sound file of any format that the library reads or decodes.
 
     With `sample_rate` and `channels` frames come at another rate, and in other channels: one goes to all, all are averaged
     to one, else surplus channels are left out and missing ones silent. A long read of compressed sound is decoded by `threads` threads
-    at most, by four without it, as far as there are processors that nothing else here is read on.
+    at most, as far as there are processors that nothing else here is read on.
     """
     return AudioFile(path, sample_rate=sample_rate, channels=channels, threads=threads)

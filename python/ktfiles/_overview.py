@@ -12,7 +12,7 @@ from ._paths import Path, encoded
 FRAMES_PER_POINT: int = _core.FRAMES_PER_POINT
 
 
-class Overview(np.ndarray):  # type: ignore[type-arg]
+class Overview(np.ndarray[Any, np.dtype[np.int8]]):
     """The lowest and the highest sample of each 256 frames of every channel: int8, (points, channels, 2).
 
     Full scale is 127, and silence is in every point.

@@ -111,6 +111,18 @@ def test_a_forked_process_reads_too(sound):
     assert ktfiles.chunks(path)["note"] == b"of the child"
 
 
+def test_a_pool_of_processes_decodes(sound):
+    """Processes that part from one in which threads of the library are idle."""
+    path = sound("a.flac", frames=1_200_000)
+    with ktfiles.open(path, threads=2) as f:
+        expected = f.read()
+    child = os.fork()
+    if child == 0:
+        with ktfiles.open(path, threads=2) as f:
+            os._exit(0 if np.array_equal(f.read(), expected) else 1)
+    assert os.waitpid(child, 0)[1] == 0
+
+
 def test_the_interpreter_ends_whatever_is_under_way(sound, script):
     path = sound("a.flac", frames=200000)
     code = """

@@ -75,7 +75,7 @@ class DocumentsTest(TypedTest):
             for lines in blocks(README, language):
                 includes = [line for line in lines if line.startswith("#include")]
                 program = "\n".join([*includes, "int main(void) {", *(line for line in lines if line not in includes), "}"])
-                subprocess.run([*compiler, "-fsyntax-only", "-Wall", "-Wextra", "-Werror", "-I", ROOT / "src", "-"],
+                subprocess.run([*compiler, "-fsyntax-only", "-Wall", "-Wextra", "-Werror", "-I", ROOT / "src", "-I", ROOT / "c", "-"],
                                input=program, text=True, check=True)
 
     def assert_works(self, command):

@@ -50,7 +50,7 @@ public:
         const std::string folder = resolvedFolder(path);
         information_ = ProjectInformation::initWithProjectURL(platform::URL::createWithFileSystemBytes(folder, true));
         if (!information_)
-            throw Problem(path, kStatusParameterError,
+            throw Problem(path, kStatusFileNotFound, // what makes a folder a package
                           "is no project package: Resources/ProjectInformation.plist cannot be read");
     }
 

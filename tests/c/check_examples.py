@@ -2,6 +2,7 @@
 
 Usage: check_examples.py SOURCE_ROOT FOLDER_OF_PROGRAMS
 """
+import json
 import pathlib
 import re
 import shlex
@@ -57,10 +58,30 @@ class Examples(unittest.TestCase):
         both = b"".join(2 * wanted[at : at + 2] for at in range(0, len(wanted), 2))
         self.assertEqual((self.folder / "out.pcm").read_bytes(), both)
 
+    def test_notes(self):
+        for text in "recorded on a rainy day", "again":
+            self.assertEqual(self.run_program("add_note", "tone-16.wav", text), text + "\n")
+        with wave.open(str(self.folder / "tone-16.wav")) as file:
+            self.assertGreater(file.getnframes(), 0)
+
+    def test_pictures_and_documents(self):
+        rows = self.run_program("overview", "percussion.wav").splitlines()
+        self.assertEqual([len(row) for row in rows], [60] * 8)
+        heights = ["".join(column).count("#") for column in zip(*rows)]
+        self.assertTrue(max(heights) > 4 and min(heights) < 2 and all("".join(c) == "".join(sorted(c)) for c in zip(*rows)))
+        self.assertIn("Gulls", json.dumps(json.loads(self.run_program("adm", "harbour-bw64.wav"))))
+
+    def test_a_held_file(self):
+        self.assertEqual(self.run_program("hold_file", "tone-16.wav", "echo held"), "held\n")
+        self.run_program("hold_file", "tone-16.wav", "./missing 2> /dev/null", status=1)
+
     def test_failures(self):
         self.assertEqual(self.run_program("describe", "nothing.wav", status=1), "nothing.wav: file not found\n")
         self.assertEqual(self.run_program("to_pcm", "nothing.wav", "out.pcm", status=1), "nothing.wav: file not found\n")
         self.assertFalse((self.folder / "out.pcm").exists())
+        self.assertEqual(self.run_program("adm", "tone-16.wav", status=1).count("\n"), 1)
+        for program in ("overview", "adm", "hold_file", "add_note"):
+            self.run_program(program, status=2)
 
 
 unittest.main(argv=sys.argv[:1])

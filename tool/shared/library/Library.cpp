@@ -1,0 +1,84 @@
+#include "tool/shared/library/Library.h"
+
+#include "platform/Places.h"
+#include "tool/shared/library/LibrarySchema.h"
+#include "tool/shared/library/SQLFailure.h"
+
+#include <filesystem>
+#include <system_error>
+#include <unistd.h>
+
+namespace {
+
+// Only the user may look into the folder, as with other data of the desktop.
+void makeFolderOf(const std::string& path)
+{
+    namespace fs = std::filesystem;
+    const fs::path folder = fs::path(path).parent_path();
+    if (folder.empty() || fs::exists(folder))
+        return;
+    std::error_code error;
+    fs::create_directories(folder, error);
+    if (error)
+        throw Failure("its folder cannot be made: " + SystemErrorText(error.value()));
+    fs::permissions(folder, fs::perms::owner_all, error);
+}
+
+SQLDatabase opened(const std::string& path, SQLDatabase::Mode mode)
+{
+    if (mode == SQLDatabase::Mode::create)
+        makeFolderOf(path);
+    else if (::access(path.c_str(), F_OK) != 0)
+        throw Failure("there is no index; ktfiles index FOLDER makes one");
+    return SQLDatabase(path, mode);
+}
+
+} // namespace
+
+std::string defaultLibrary()
+{
+    return platform::places().dataHome + "/ktfiles/library.db";
+}
+
+Library::Library(const std::string& path, SQLDatabase::Mode mode) : database_(opened(path, mode))
+{
+    if (mode == SQLDatabase::Mode::read) {
+        requireLibrary(database_);
+    } else {
+        prepareLibrary(database_); // looks at the version before anything is written
+        database_.run("PRAGMA journal_mode = WAL; PRAGMA synchronous = NORMAL; PRAGMA foreign_keys = ON");
+    }
+    // Two gigabytes of address space at most: pages are read from the system's cache without a copy.
+    database_.run("PRAGMA mmap_size = 2147483648; PRAGMA cache_size = -65536; PRAGMA temp_store = MEMORY");
+}
+
+std::string libraryColumnNames()
+{
+    std::string names;
+    for (const LibraryColumn& column : libraryColumns())
+        names += std::string(names.empty() ? "f." : ", f.") + column.name;
+    return names;
+}
+
+void readLibraryColumns(LibraryRecord& record, const SQLStatement& row, int first)
+{
+    struct Reading {
+        LibraryRecord& record;
+        const SQLStatement& row;
+        int column;
+
+        void operator()(LibraryRecord::Text LibraryRecord::*member) const { record.*member = row.text(column); }
+        void operator()(LibraryRecord::Whole LibraryRecord::*member) const
+        {
+            if (!row.isNull(column))
+                record.*member = row.number(column);
+        }
+        void operator()(LibraryRecord::Real LibraryRecord::*member) const
+        {
+            if (!row.isNull(column))
+                record.*member = row.real(column);
+        }
+    };
+    for (const LibraryColumn& column : libraryColumns())
+        std::visit(Reading{record, row, first++}, column.member);
+}

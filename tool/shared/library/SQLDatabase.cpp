@@ -1,0 +1,223 @@
+#include "tool/shared/library/SQLDatabase.h"
+
+#include "tool/shared/library/SQLFailure.h"
+
+#include <sqlite3.h>
+
+namespace {
+
+// How long a writer waits for another one. Transactions of an index are short.
+constexpr int kPatienceMilliseconds = 60'000;
+
+int flagsOf(SQLDatabase::Mode mode)
+{
+    switch (mode) {
+    case SQLDatabase::Mode::read:
+        return SQLITE_OPEN_READONLY;
+    case SQLDatabase::Mode::write:
+        return SQLITE_OPEN_READWRITE;
+    case SQLDatabase::Mode::create:
+        break;
+    }
+    return SQLITE_OPEN_READWRITE | SQLITE_OPEN_CREATE;
+}
+
+std::string wordsFor(sqlite3* handle, int code)
+{
+    switch (code & 0xff) {
+    case SQLITE_FULL:
+        return "the disk is full";
+    case SQLITE_NOTADB:
+        return "is no index: it is no SQLite database";
+    case SQLITE_CORRUPT:
+        return "the index is damaged; make it anew";
+    case SQLITE_BUSY:
+    case SQLITE_LOCKED:
+        return "another program keeps it busy";
+    case SQLITE_READONLY:
+        return "cannot be written";
+    case SQLITE_CANTOPEN:
+        return "cannot be opened";
+    case SQLITE_NOMEM:
+        return "out of memory";
+    case SQLITE_IOERR: {
+        const int error = handle != nullptr ? sqlite3_system_errno(handle) : 0;
+        return error != 0 ? std::string(SystemErrorText(error)) : "input/output error";
+    }
+    default:
+        return handle != nullptr ? sqlite3_errmsg(handle) : sqlite3_errstr(code);
+    }
+}
+
+} // namespace
+
+void failForSQL(sqlite3* handle, int code)
+{
+    throw SQLFailure(wordsFor(handle, code), code & 0xff);
+}
+
+void SQLDatabase::Closing::operator()(sqlite3* handle) const
+{
+    sqlite3_close_v2(handle);
+}
+
+SQLDatabase::SQLDatabase(const std::string& path, Mode mode) : path_(path)
+{
+    sqlite3* handle = nullptr;
+    // One thread uses a connection at a time, which needs no locks inside it.
+    const int code = sqlite3_open_v2(path.c_str(), &handle, flagsOf(mode) | SQLITE_OPEN_NOMUTEX, nullptr);
+    handle_.reset(handle);
+    if (code != SQLITE_OK)
+        failForSQL(handle, code);
+    sqlite3_busy_timeout(handle, kPatienceMilliseconds);
+}
+
+void SQLDatabase::run(const std::string& sql)
+{
+    if (const int code = sqlite3_exec(handle(), sql.c_str(), nullptr, nullptr, nullptr); code != SQLITE_OK)
+        failForSQL(handle(), code);
+}
+
+std::int64_t SQLDatabase::number(const std::string& sql)
+{
+    SQLStatement statement(*this, sql);
+    return statement.step() ? statement.number(0) : 0;
+}
+
+std::int64_t SQLDatabase::lastRow() const
+{
+    return sqlite3_last_insert_rowid(handle());
+}
+
+std::int64_t SQLDatabase::changes() const
+{
+    return sqlite3_changes64(handle());
+}
+
+void SQLStatement::Finalizing::operator()(sqlite3_stmt* statement) const
+{
+    sqlite3_finalize(statement);
+}
+
+namespace {
+
+sqlite3* databaseOf(sqlite3_stmt* statement)
+{
+    return sqlite3_db_handle(statement);
+}
+
+void requireBound(sqlite3_stmt* statement, int code)
+{
+    if (code != SQLITE_OK)
+        failForSQL(databaseOf(statement), code);
+}
+
+} // namespace
+
+SQLStatement::SQLStatement(const SQLDatabase& database, std::string_view sql)
+{
+    sqlite3_stmt* statement = nullptr;
+    const int code = sqlite3_prepare_v3(database.handle(), sql.data(), static_cast<int>(sql.size()),
+                                        SQLITE_PREPARE_PERSISTENT, &statement, nullptr);
+    if (code != SQLITE_OK)
+        failForSQL(database.handle(), code);
+    statement_.reset(statement);
+}
+
+SQLStatement& SQLStatement::bind(int parameter, std::int64_t number)
+{
+    requireBound(statement_.get(), sqlite3_bind_int64(statement_.get(), parameter, number));
+    return *this;
+}
+
+SQLStatement& SQLStatement::bind(int parameter, double number)
+{
+    requireBound(statement_.get(), sqlite3_bind_double(statement_.get(), parameter, number));
+    return *this;
+}
+
+SQLStatement& SQLStatement::bind(int parameter, std::string_view text)
+{
+    requireBound(statement_.get(), sqlite3_bind_text64(statement_.get(), parameter, text.data(), text.size(),
+                                                       SQLITE_STATIC, SQLITE_UTF8));
+    return *this;
+}
+
+SQLStatement& SQLStatement::bindBytes(int parameter, std::string_view bytes)
+{
+    requireBound(statement_.get(),
+                 sqlite3_bind_blob64(statement_.get(), parameter, bytes.data(), bytes.size(), SQLITE_STATIC));
+    return *this;
+}
+
+SQLStatement& SQLStatement::bindNull(int parameter)
+{
+    requireBound(statement_.get(), sqlite3_bind_null(statement_.get(), parameter));
+    return *this;
+}
+
+bool SQLStatement::step()
+{
+    const int code = sqlite3_step(statement_.get());
+    if (code == SQLITE_ROW)
+        return true;
+    if (code != SQLITE_DONE) {
+        sqlite3* const database = databaseOf(statement_.get());
+        const SQLFailure failure(wordsFor(database, code), code & 0xff);
+        sqlite3_reset(statement_.get());
+        throw failure;
+    }
+    sqlite3_reset(statement_.get());
+    return false;
+}
+
+void SQLStatement::run()
+{
+    while (step()) {
+    }
+}
+
+void SQLStatement::reset()
+{
+    sqlite3_reset(statement_.get());
+}
+
+bool SQLStatement::isNull(int column) const
+{
+    return sqlite3_column_type(statement_.get(), column) == SQLITE_NULL;
+}
+
+std::int64_t SQLStatement::number(int column) const
+{
+    return sqlite3_column_int64(statement_.get(), column);
+}
+
+double SQLStatement::real(int column) const
+{
+    return sqlite3_column_double(statement_.get(), column);
+}
+
+std::string_view SQLStatement::bytes(int column) const
+{
+    const void* const bytes = sqlite3_column_blob(statement_.get(), column);
+    const int size = sqlite3_column_bytes(statement_.get(), column);
+    return bytes == nullptr ? std::string_view()
+                            : std::string_view(static_cast<const char*>(bytes), static_cast<std::size_t>(size));
+}
+
+SQLTransaction::SQLTransaction(SQLDatabase& database) : database_(&database)
+{
+    database.run("BEGIN IMMEDIATE");
+}
+
+SQLTransaction::~SQLTransaction()
+{
+    if (database_ != nullptr)
+        sqlite3_exec(database_->handle(), "ROLLBACK", nullptr, nullptr, nullptr);
+}
+
+void SQLTransaction::commit()
+{
+    database_->run("COMMIT");
+    database_ = nullptr;
+}

@@ -2,7 +2,7 @@
 #pragma once
 
 #include "platform/core/KTMem.h"
-#include "tool/overview/WaveformOutline.h"
+#include "tool/shared/waveform/WaveformOutline.h"
 #include "tool/shared/input/SoundReader.h"
 
 #include <memory>

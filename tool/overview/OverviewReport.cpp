@@ -1,6 +1,6 @@
 #include "tool/overview/OverviewReport.h"
 
-#include "tool/overview/Sparkline.h"
+#include "tool/shared/waveform/Sparkline.h"
 #include "tool/shared/input/FolderWalk.h"
 #include "tool/shared/output/ClockTime.h"
 #include "tool/shared/output/DisplayWidth.h"

@@ -2,7 +2,7 @@
 #pragma once
 
 #include "tool/overview/SoundLanes.h"
-#include "tool/overview/WaveformOutline.h"
+#include "tool/shared/waveform/WaveformOutline.h"
 
 #include <cstdint>
 #include <vector>

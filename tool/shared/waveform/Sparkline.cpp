@@ -1,4 +1,4 @@
-#include "tool/overview/Sparkline.h"
+#include "tool/shared/waveform/Sparkline.h"
 
 #include <algorithm>
 #include <array>

@@ -1,4 +1,4 @@
-#include "tool/overview/WaveformOutline.h"
+#include "tool/shared/waveform/WaveformOutline.h"
 
 #include <algorithm>
 #include <array>

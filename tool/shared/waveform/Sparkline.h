@@ -1,7 +1,7 @@
 // A waveform in one line of text.
 #pragma once
 
-#include "tool/overview/WaveformOutline.h"
+#include "tool/shared/waveform/WaveformOutline.h"
 
 #include <string>
 

@@ -1,0 +1,47 @@
+#include "tool/shared/library/LibraryQuery.h"
+
+#include <algorithm>
+
+namespace {
+
+constexpr std::int64_t kNotes = 12;
+
+void addOnce(std::vector<KeyChoice>& keys, KeyChoice key)
+{
+    if (std::ranges::find(keys, key) == keys.end())
+        keys.push_back(std::move(key));
+}
+
+} // namespace
+
+std::vector<NumberRange> wantedTempos(const LibraryQuery& query)
+{
+    std::vector<NumberRange> tempos = query.tempos;
+    if (query.takesRelated)
+        for (const NumberRange& tempo : query.tempos) {
+            tempos.push_back({tempo.least / 2, tempo.most / 2});
+            tempos.push_back({tempo.least * 2, tempo.most * 2});
+        }
+    return tempos;
+}
+
+std::vector<KeyChoice> wantedKeys(const LibraryQuery& query)
+{
+    constexpr std::int64_t minorThird = 3;
+    std::vector<KeyChoice> keys;
+    for (const KeyChoice& key : query.keys)
+        addOnce(keys, key);
+    if (!query.takesRelated)
+        return keys;
+    for (const KeyChoice& key : query.keys) {
+        if (!key.note)
+            continue;
+        if (!key.mode.empty())
+            addOnce(keys, {key.note, key.mode == "minor" ? "major" : "minor"});
+        if (key.mode != "major")
+            addOnce(keys, {(*key.note + minorThird) % kNotes, "major"});
+        if (key.mode != "minor")
+            addOnce(keys, {(*key.note + kNotes - minorThird) % kNotes, "minor"});
+    }
+    return keys;
+}

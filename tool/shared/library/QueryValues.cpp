@@ -1,0 +1,244 @@
+#include "tool/shared/library/QueryValues.h"
+
+#include "platform/core/ASCIICase.h"
+#include "tool/shared/output/ClockTime.h"
+
+#include <algorithm>
+#include <array>
+#include <charconv>
+#include <cmath>
+#include <ctime>
+#include <iterator>
+
+namespace {
+
+std::string_view trimmed(std::string_view text)
+{
+    const std::size_t start = std::min(text.find_first_not_of(" \t"), text.size());
+    return text.substr(start, text.find_last_not_of(" \t") + 1 - start);
+}
+
+std::string lower(std::string_view text)
+{
+    std::string result(text);
+    std::ranges::transform(result, result.begin(), asciiLower);
+    return result;
+}
+
+struct Unit {
+    std::string_view name;
+    double factor;
+};
+
+// The longest name that ends the text counts.
+std::optional<double> numberWithUnit(std::string_view text, std::span<const Unit> units)
+{
+    const std::string lowered = lower(trimmed(text));
+    for (const Unit& unit : units)
+        if (lowered.ends_with(unit.name))
+            if (const auto number = plainNumberFromText(
+                    trimmed(std::string_view(lowered).substr(0, lowered.size() - unit.name.size()))))
+                return *number * unit.factor;
+    return std::nullopt;
+}
+
+std::optional<int> wholeNumber(std::string_view text, int least, int most)
+{
+    int number = 0;
+    const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), number);
+    const bool isWhole = !text.empty() && error == std::errc() && end == text.data() + text.size();
+    return isWhole && number >= least && number <= most ? std::optional(number) : std::nullopt;
+}
+
+// Takes so many digits, and the separator behind them unless the text ends there.
+std::optional<int> takeDigits(std::string_view& text, std::size_t digits, std::string_view separators, int least,
+                              int most)
+{
+    const std::string_view part = text.substr(0, digits);
+    if (part.size() != digits || !std::ranges::all_of(part, [](char c) { return c >= '0' && c <= '9'; }))
+        return std::nullopt;
+    text.remove_prefix(digits);
+    if (!text.empty() && text.front() != 'Z') {
+        if (separators.find(text.front()) == separators.npos)
+            return std::nullopt;
+        text.remove_prefix(1);
+        if (text.empty())
+            return std::nullopt;
+    }
+    return wholeNumber(part, least, most);
+}
+
+std::optional<std::int64_t> nanoseconds(std::tm time, bool isUTC)
+{
+    constexpr std::int64_t kNanoseconds = 1'000'000'000;
+    const std::tm asked = time;
+    time.tm_isdst = -1;
+    const std::time_t seconds = isUTC ? ::timegm(&time) : std::mktime(&time);
+    if (time.tm_mday != asked.tm_mday || time.tm_mon != asked.tm_mon) // the 31st of a month that has 30
+        return std::nullopt;
+    return static_cast<std::int64_t>(seconds) * kNanoseconds;
+}
+
+// "2026-11-01", "2026-11-01T12:30", "2026-11-01 12:30:05Z".
+std::optional<std::int64_t> dateFromText(std::string_view text)
+{
+    std::tm time{};
+    const auto take = [&](int& field, std::size_t digits, std::string_view separators, int least, int most, int base) {
+        const auto number = takeDigits(text, digits, separators, least, most);
+        field = number.value_or(0) - base;
+        return number.has_value();
+    };
+    if (!take(time.tm_year, 4, "-", 1970, 2200, 1900) || !take(time.tm_mon, 2, "-", 1, 12, 1) ||
+        !take(time.tm_mday, 2, "T ", 1, 31, 0))
+        return std::nullopt;
+    if (!text.empty() && text != "Z") {
+        if (!take(time.tm_hour, 2, ":", 0, 23, 0) || text.empty() || !take(time.tm_min, 2, ":", 0, 59, 0))
+            return std::nullopt;
+        if (!text.empty() && text != "Z" && !take(time.tm_sec, 2, "", 0, 60, 0))
+            return std::nullopt;
+    }
+    if (!text.empty() && text != "Z")
+        return std::nullopt;
+    return nanoseconds(time, text == "Z");
+}
+
+// Midnight at the beginning of the day so many days ago, in local time.
+std::optional<std::int64_t> daysAgo(int days)
+{
+    const std::time_t now = std::time(nullptr);
+    std::tm day{};
+    ::localtime_r(&now, &day);
+    std::tm midnight{};
+    midnight.tm_year = day.tm_year;
+    midnight.tm_mon = day.tm_mon;
+    midnight.tm_mday = day.tm_mday - days;
+    midnight.tm_isdst = -1;
+    return static_cast<std::int64_t>(std::mktime(&midnight)) * 1'000'000'000;
+}
+
+// Removes a sign of raised or lowered notes; its semitones.
+int takeAccidental(std::string_view& text)
+{
+    constexpr std::pair<std::string_view, int> kSigns[] = {{"♯", 1},      {"♭", -1},     {"#", 1},      {"b", -1},
+                                                           {" sharp", 1}, {" flat", -1}, {"-sharp", 1}, {"-flat", -1},
+                                                           {"sharp", 1},  {"flat", -1}};
+    for (const auto& [sign, semitones] : kSigns)
+        if (text.starts_with(sign)) {
+            text.remove_prefix(sign.size());
+            return semitones;
+        }
+    return 0;
+}
+
+// Of a word behind a note, or alone; none for another word.
+std::optional<std::string> modeFromText(std::string_view text)
+{
+    constexpr std::pair<std::string_view, std::string_view> kModes[] = {
+        {"", ""}, {"m", "minor"}, {"min", "minor"}, {"minor", "minor"}, {"maj", "major"}, {"major", "major"}};
+    if (text == "M")
+        return "major";
+    const std::string word = lower(text);
+    const auto* const found = std::ranges::find(kModes, word, [](const auto& each) { return each.first; });
+    return found != std::end(kModes) ? std::optional(std::string(found->second)) : std::nullopt;
+}
+
+} // namespace
+
+std::optional<double> plainNumberFromText(std::string_view text)
+{
+    double number = 0;
+    const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), number, std::chars_format::fixed);
+    const bool isNumber = error == std::errc() && end == text.data() + text.size() && std::isfinite(number);
+    return isNumber && number >= 0 ? std::optional(number) : std::nullopt;
+}
+
+std::optional<double> secondsFromText(std::string_view text)
+{
+    constexpr Unit kUnits[] = {{"ms", 0.001}, {"min", 60}, {"sec", 1}, {"s", 1}, {"m", 60}, {"h", 3600}};
+    const std::string plain(trimmed(text));
+    if (const auto seconds = timeFromText(plain))
+        return seconds;
+    return numberWithUnit(plain, kUnits);
+}
+
+std::optional<double> rateFromText(std::string_view text)
+{
+    constexpr Unit kUnits[] = {{"khz", 1000}, {"k", 1000}, {"hz", 1}, {"", 1}};
+    const auto rate = numberWithUnit(text, kUnits);
+    // 44.1 thousands are whole Hz although their product is not quite.
+    return rate ? std::optional(std::round(*rate * 1000) / 1000) : std::nullopt;
+}
+
+std::optional<NumberRange> rangeFromText(std::string_view text, const NumberReader& read)
+{
+    text = trimmed(text);
+    const std::size_t dots = text.find("..");
+    if (dots == text.npos) {
+        const auto number = read(text);
+        return number ? std::optional(NumberRange{*number, *number}) : std::nullopt;
+    }
+    NumberRange range;
+    const std::string_view first = trimmed(text.substr(0, dots)), last = trimmed(text.substr(dots + 2));
+    if (!first.empty()) {
+        const auto least = read(first);
+        if (!least)
+            return std::nullopt;
+        range.least = *least;
+    }
+    if (!last.empty()) {
+        const auto most = read(last);
+        if (!most)
+            return std::nullopt;
+        range.most = *most;
+    }
+    const bool isEmpty = first.empty() && last.empty();
+    return isEmpty || range.least > range.most ? std::nullopt : std::optional(range);
+}
+
+std::optional<NumberRange> tempoFromText(std::string_view text)
+{
+    constexpr double kTolerance = 0.5;
+    auto range = rangeFromText(text, plainNumberFromText);
+    if (range && text.find("..") == text.npos) {
+        range->least -= kTolerance;
+        range->most += kTolerance;
+    }
+    return range;
+}
+
+std::optional<KeyChoice> keyFromText(std::string_view text)
+{
+    constexpr std::string_view kLetters = "c d ef g a b"; // at their semitones
+    constexpr int kNotes = 12;
+    text = trimmed(text);
+    if (text.empty())
+        return std::nullopt;
+    if (const auto mode = modeFromText(text); mode && text.size() > 1) // "m" alone says too little
+        return KeyChoice{std::nullopt, *mode};
+    const std::size_t semitones = text.front() == ' ' ? kLetters.npos : kLetters.find(asciiLower(text.front()));
+    if (semitones == kLetters.npos)
+        return std::nullopt;
+    text.remove_prefix(1);
+    const int note = (static_cast<int>(semitones) + takeAccidental(text) + kNotes) % kNotes;
+    if (text.starts_with('-') || text.starts_with('_'))
+        text.remove_prefix(1);
+    const auto mode = modeFromText(trimmed(text));
+    return mode ? std::optional(KeyChoice{note, *mode}) : std::nullopt;
+}
+
+std::optional<std::int64_t> sinceFromText(std::string_view text)
+{
+    constexpr double kDay = 86400, kMostSeconds = 1e10;
+    constexpr Unit kAges[] = {{"min", 60},           {"h", 3600},          {"days", kDay},        {"day", kDay},
+                              {"d", kDay},           {"weeks", 7 * kDay},  {"week", 7 * kDay},    {"w", 7 * kDay},
+                              {"months", 30 * kDay}, {"month", 30 * kDay}, {"years", 365 * kDay}, {"year", 365 * kDay},
+                              {"y", 365 * kDay}};
+    text = trimmed(text);
+    if (equalIgnoringASCIICase(text, "today"))
+        return daysAgo(0);
+    if (equalIgnoringASCIICase(text, "yesterday"))
+        return daysAgo(1);
+    if (const auto age = numberWithUnit(text, kAges); age && *age <= kMostSeconds)
+        return (static_cast<std::int64_t>(std::time(nullptr)) - std::llround(*age)) * 1'000'000'000;
+    return dateFromText(text);
+}

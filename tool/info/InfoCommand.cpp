@@ -1,7 +1,7 @@
 // ktfiles info: describes audio files.
 #include "audiofile/AudioDigest.h"
 #include "platform/core/HexText.h"
-#include "tool/info/FileDescription.h"
+#include "tool/shared/description/FileDescription.h"
 #include "tool/info/InfoCheck.h"
 #include "tool/shared/access/FileAccess.h"
 #include "tool/shared/arguments/CommandLine.h"
@@ -16,14 +16,7 @@
 #include "tool/shared/output/Progress.h"
 #include "tool/shared/output/Table.h"
 
-#include <cmath>
-
 namespace {
-
-double durationOf(const AudioFileInfo& info)
-{
-    return info.exactSampleRate > 0 ? static_cast<double>(info.frames) / info.exactSampleRate : 0;
-}
 
 std::string rateText(const AudioFileInfo& info)
 {
@@ -52,16 +45,6 @@ std::string lengthText(const AudioFileInfo& info)
     if (promised == 0 || info.exactSampleRate <= 0)
         return info.missingDataSize > 0 ? there + ", cut" : there;
     return fmt::format("{} of {}", there, durationText(static_cast<double>(promised) / info.exactSampleRate));
-}
-
-/// Bits per second of compressed sound; 0 if unknown, as for one track of several.
-std::int64_t bitRateOf(const AudioFileInfo& info)
-{
-    if (info.audioTracks > 1)
-        return 0;
-    const double duration = durationOf(info);
-    const std::int64_t bytes = info.dataSize > 0 ? info.dataSize : info.fileLength;
-    return info.compressed && duration > 0 ? std::llround(static_cast<double>(bytes) * 8 / duration) : 0;
 }
 
 std::string typeByNameText(const FileFacts& facts)

@@ -1,7 +1,7 @@
 #include "tool/meta/MetaCommand.h"
 
 #include "audiofile/fields/FileMetadata.h"
-#include "tool/meta/MetaFile.h"
+#include "tool/shared/metadata/MetaFile.h"
 #include "tool/meta/MetaText.h"
 #include "tool/shared/access/FileAccess.h"
 #include "tool/shared/arguments/CommandLine.h"

@@ -1,7 +1,7 @@
 #include "tool/meta/MetaCopySource.h"
 
 #include "media/containers/ContainerHeaders.h"
-#include "tool/meta/MetaFile.h"
+#include "tool/shared/metadata/MetaFile.h"
 #include "tool/shared/input/InputFile.h"
 #include "tool/shared/output/Failure.h"
 #include "tool/shared/portable/PortableMarkers.h"

@@ -4,7 +4,7 @@
 #include "media/containers/ContainerHeaders.h"
 #include "media/userdata/AudioFileService.h"
 #include "platform/core/Status.h"
-#include "tool/meta/MetaFile.h"
+#include "tool/shared/metadata/MetaFile.h"
 #include "tool/shared/edits/EditProblems.h"
 #include "tool/shared/input/FileLocation.h"
 #include "tool/shared/input/InputFile.h"

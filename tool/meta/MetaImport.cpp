@@ -1,7 +1,7 @@
 // ktfiles meta import: sets the fields of many files from one table.
 #include "tool/meta/MetaCommand.h"
 #include "tool/meta/MetaEdits.h"
-#include "tool/meta/MetaFile.h"
+#include "tool/shared/metadata/MetaFile.h"
 #include "tool/meta/MetaTable.h"
 #include "tool/shared/access/FileAccess.h"
 #include "tool/shared/arguments/CommandLine.h"

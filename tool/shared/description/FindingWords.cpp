@@ -1,4 +1,4 @@
-#include "tool/info/FindingWords.h"
+#include "tool/shared/description/FindingWords.h"
 
 #include <fmt/format.h>
 

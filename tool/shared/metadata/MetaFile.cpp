@@ -1,4 +1,4 @@
-#include "tool/meta/MetaFile.h"
+#include "tool/shared/metadata/MetaFile.h"
 
 #include "tool/shared/input/InputFile.h"
 #include "tool/shared/output/Failure.h"

@@ -1,4 +1,4 @@
-#include "tool/info/AdmFindings.h"
+#include "tool/shared/description/AdmFindings.h"
 
 #include "media/containers/ContainerCheck.h"
 #include "tool/shared/adm/AdmFile.h"

@@ -6,8 +6,15 @@
 #include <cstdint>
 #include <string>
 
-/// Throws Failure.
+/// Keeps writers away while it reads. Throws Failure.
 AudioFileInfo describeFile(const std::string& path, bool quiet);
+/// The same for a file that the caller keeps writers away from.
+AudioFileInfo describeSound(const std::string& path);
 
 /// The number of frames that the headers promise if it exceeds the real one; 0 if that is unknown.
 std::int64_t promisedFrames(const AudioFileInfo& info);
+
+/// 0 if it is unknown.
+double durationOf(const AudioFileInfo& info);
+/// Bits per second of compressed sound; 0 if unknown, as for one track of several.
+std::int64_t bitRateOf(const AudioFileInfo& info);

@@ -1,7 +1,7 @@
 #include "tool/info/InfoCheck.h"
 
 #include "tool/shared/access/FileAccess.h"
-#include "tool/shared/description/FileProblems.h"
+#include "tool/shared/description/FoundProblems.h"
 #include "tool/shared/input/FileByFile.h"
 #include "tool/shared/output/DataRecords.h"
 #include "tool/shared/output/DisplayWidth.h"
@@ -12,7 +12,7 @@ class CheckWriter : DataRecords {
 public:
     explicit CheckWriter(const OutputOptions& options) : DataRecords(options, kColumns), form_(outputForm(options)) {}
 
-    void add(const std::string& path, const std::vector<FileProblem>& problems)
+    void add(const std::string& path, const std::vector<FoundProblem>& problems)
     {
         isGood_ = isGood_ && problems.empty();
         if (form_ == Form::json)
@@ -20,7 +20,7 @@ public:
         else if (form_ == Form::csv)
             addRows(path, problems);
         else if (form_ != Form::none)
-            for (const FileProblem& problem : problems)
+            for (const FoundProblem& problem : problems)
                 addLine(fmt::format("{}: {}{}; {}", printable(path), placeText(problem), problem.text, problem.effect));
     }
     using DataRecords::addFailure;
@@ -28,18 +28,18 @@ public:
     bool isGood() const { return isGood_; }
 
 private:
-    static std::string placeText(const FileProblem& problem)
+    static std::string placeText(const FoundProblem& problem)
     {
         if (problem.chunk == 0)
             return {};
         return fmt::format("{}: \"{}\" ", problem.offset, printable(fourCCText(problem.chunk)));
     }
-    void addRecord(const std::string& path, const std::vector<FileProblem>& problems)
+    void addRecord(const std::string& path, const std::vector<FoundProblem>& problems)
     {
         JsonWriter& json = jsonRecords().begin();
         json.beginObject().member("path", path);
         json.key("findings").beginArray();
-        for (const FileProblem& problem : problems) {
+        for (const FoundProblem& problem : problems) {
             recordOf(problem, {}).write(json.beginObject());
             json.endObject();
         }
@@ -47,15 +47,15 @@ private:
         jsonRecords().end();
     }
     /// One row per finding; a file without findings has a row with its path alone.
-    void addRows(const std::string& path, const std::vector<FileProblem>& problems)
+    void addRows(const std::string& path, const std::vector<FoundProblem>& problems)
     {
         const Record file = Record().member("path", path);
         if (problems.empty())
             csvRecords().add(file);
-        for (const FileProblem& problem : problems)
+        for (const FoundProblem& problem : problems)
             csvRecords().add(recordOf(problem, file));
     }
-    static Record recordOf(const FileProblem& problem, Record record)
+    static Record recordOf(const FoundProblem& problem, Record record)
     {
         record.member("kind", problem.name);
         if (problem.chunk != 0)
@@ -81,10 +81,9 @@ bool checkFiles(const FileArguments& files, unsigned threads, const OutputOption
 {
     CheckWriter writer(options);
     const FileLoop loop{.threads = threads, .doing = "checking", .quiet = options.quiet};
-    const bool wereRead = writeFileByFile(writer, files, loop,
-                                          [&](const FoundFile& file) {
-            const FileAccess access = accessForReading(file.path, {.quiet = options.quiet});
-            return problemsOf(file.path, {.comparesDigests = true, .showsProgress = !options.quiet});
-        });
+    const bool wereRead = writeFileByFile(writer, files, loop, [&](const FoundFile& file) {
+        const FileAccess access = accessForReading(file.path, {.quiet = options.quiet});
+        return problemsOf(file.path, {.comparesDigests = true, .showsProgress = !options.quiet});
+    });
     return wereRead && writer.isGood();
 }

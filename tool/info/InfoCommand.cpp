@@ -1,11 +1,11 @@
 // ktfiles info: describes audio files.
 #include "audiofile/AudioDigest.h"
 #include "platform/core/HexText.h"
-#include "tool/shared/description/FileDescription.h"
 #include "tool/info/InfoCheck.h"
 #include "tool/shared/access/FileAccess.h"
 #include "tool/shared/arguments/CommandLine.h"
 #include "tool/shared/arguments/ThreadsOption.h"
+#include "tool/shared/description/FileDescription.h"
 #include "tool/shared/input/CodingWords.h"
 #include "tool/shared/input/FileByFile.h"
 #include "tool/shared/input/FileFacts.h"

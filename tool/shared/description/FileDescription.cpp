@@ -1,7 +1,7 @@
 #include "tool/shared/description/FileDescription.h"
 
+#include "media/containers/AudioHandle.h"
 #include "tool/shared/access/FileAccess.h"
-#include "tool/shared/input/CodingWords.h"
 #include "tool/shared/input/InputFile.h"
 #include "tool/shared/output/Failure.h"
 
@@ -15,24 +15,27 @@ AudioFileInfo describeFile(const std::string& path, bool quiet)
 
 AudioFileInfo describeSound(const std::string& path)
 {
-    CFileIO file;
-    requireOK(file.OpenRead(referenceTo(path), 0));
-    AudioFileInfo info;
-    const std::int32_t status = GetAudioFileInfo(file, 0, info);
-    if (status == platform::AudioHandle::kFormatNotSupported) { // known, but not decoded here
-        CAudioFileIO audio;
-        openAudio(audio, path);
-    }
-    if (status != kStatusOK || info.containerId == 0)
+    CAudioFileIO file;
+    openSound(file, path);
+    return file.Info();
+}
+
+void openSound(CAudioFileIO& file, const std::string& path)
+{
+    requireOK(file.Open(referenceTo(path), 0));
+    describeOpened(file, path);
+}
+
+void describeOpened(CAudioFileIO& file, const std::string& path)
+{
+    const std::int32_t status = file.InfoStatus();
+    if (status == platform::AudioHandle::kFormatNotSupported) // known, but not decoded here
+        requireDecoder(file);
+    if (status != kStatusOK || file.Info().containerId == 0)
         failForSound(path, status);
-    if (info.framesAreStated) { // by a header: a decoder counts, if there is one
-        CAudioFileIO audio;
-        openAudio(audio, path);
-        if (audio.OpenDecoder() == kStatusIOError) // a decoder exists, but nothing can be decoded
-            failForSound(path, kStatusIOError);
-        return audio.Info();
-    }
-    return info;
+    const bool isStated = file.Info().framesAreStated;    // by a header: a decoder counts, if there is one
+    if (isStated && file.OpenDecoder() == kStatusIOError) // a decoder exists, but nothing can be decoded
+        failForSound(path, kStatusIOError);
 }
 
 std::int64_t promisedFrames(const AudioFileInfo& info)

@@ -1,7 +1,7 @@
 // Describes a file with the library's own readers, or with a decoder where only decoding can count.
 #pragma once
 
-#include "audiofile/AudioFileInfo.h"
+#include "audiofile/CAudioFileIO.h"
 
 #include <cstdint>
 #include <string>
@@ -10,6 +10,10 @@
 AudioFileInfo describeFile(const std::string& path, bool quiet);
 /// The same for a file that the caller keeps writers away from.
 AudioFileInfo describeSound(const std::string& path);
+/// The same, and keeps the file open; what it is says Info().
+void openSound(CAudioFileIO& file, const std::string& path);
+/// The second half: for a file that Open has opened.
+void describeOpened(CAudioFileIO& file, const std::string& path);
 
 /// The number of frames that the headers promise if it exceeds the real one; 0 if that is unknown.
 std::int64_t promisedFrames(const AudioFileInfo& info);

@@ -245,6 +245,12 @@ TagText tagTextCalled(std::string_view name)
 void writeLoopTags(JsonWriter& json, const std::string& path, const LoopTags& tags)
 {
     json.beginObject().member("path", path);
+    writeLoopTagMembers(json, tags);
+    json.endObject();
+}
+
+void writeLoopTagMembers(JsonWriter& json, const LoopTags& tags)
+{
     for (const LoopTagValue& tag : loopTagRecord(tags))
         json.member(tag.name, tag.value);
     if (!tags.chunks.empty()) {
@@ -266,5 +272,4 @@ void writeLoopTags(JsonWriter& json, const std::string& path, const LoopTags& ta
             json.beginObject().member("type", transient.transientType()).member("frame", transient.frame()).endObject();
         json.endArray();
     }
-    json.endObject();
 }

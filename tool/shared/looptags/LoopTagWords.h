@@ -28,3 +28,5 @@ std::string keyWords(const LoopTags& tags);
 
 /// Writes the whole JSON object on one line.
 void writeLoopTags(JsonWriter& json, const std::string& path, const LoopTags& tags);
+/// Writes what that object says behind the path into one that has begun.
+void writeLoopTagMembers(JsonWriter& json, const LoopTags& tags);

@@ -9,7 +9,7 @@
 #include <vector>
 
 /// One problem.
-struct FileProblem {
+struct FoundProblem {
     const char* name; // as in JSON
     std::string text, effect;
     FourCC chunk = 0; // 0 in files without chunks
@@ -23,10 +23,10 @@ struct ProblemChecks {
 };
 
 /// The caller keeps writers away. Throws Failure.
-std::vector<FileProblem> problemsOf(const std::string& path, const ProblemChecks& checks);
+std::vector<FoundProblem> problemsOf(const std::string& path, const ProblemChecks& checks);
 /// The same of a file that is open with OpenForChunks; none for a file that is no container, whose length alone can be
 /// checked.
-std::optional<std::vector<FileProblem>> problemsOfContainer(CAudioFileIO& file, const std::string& path,
-                                                            const ProblemChecks& checks);
+std::optional<std::vector<FoundProblem>> problemsOfContainer(CAudioFileIO& file, const std::string& path,
+                                                             const ProblemChecks& checks);
 /// For compressed files only the length can be checked.
-std::vector<FileProblem> problemsOfLength(const AudioFileInfo& info);
+std::vector<FoundProblem> problemsOfLength(const AudioFileInfo& info);

@@ -1,4 +1,4 @@
-#include "tool/shared/description/FileProblems.h"
+#include "tool/shared/description/FoundProblems.h"
 
 #include "audiofile/AudioFileCheck.h"
 #include "tool/shared/description/AdmFindings.h"
@@ -41,8 +41,8 @@ std::int32_t compareDigest(CAudioFileIO& file, const std::string& path, bool sho
 
 } // namespace
 
-std::optional<std::vector<FileProblem>> problemsOfContainer(CAudioFileIO& file, const std::string& path,
-                                                            const ProblemChecks& checks)
+std::optional<std::vector<FoundProblem>> problemsOfContainer(CAudioFileIO& file, const std::string& path,
+                                                             const ProblemChecks& checks)
 {
     std::vector<platform::ContainerFinding> findings;
     std::int32_t status = CheckAudioFile(file, findings);
@@ -51,7 +51,7 @@ std::optional<std::vector<FileProblem>> problemsOfContainer(CAudioFileIO& file, 
     if (status == kStatusParameterError || status == kStatusEndOfFile)
         return std::nullopt;
     requireOK(status);
-    std::vector<FileProblem> problems;
+    std::vector<FoundProblem> problems;
     for (const platform::ContainerFinding& finding : findings) {
         const FindingWords words = wordsOf(finding);
         problems.push_back({words.name, words.text, words.effect, finding.chunk, finding.offset});
@@ -64,7 +64,7 @@ std::optional<std::vector<FileProblem>> problemsOfContainer(CAudioFileIO& file, 
     return problems;
 }
 
-std::vector<FileProblem> problemsOfLength(const AudioFileInfo& info)
+std::vector<FoundProblem> problemsOfLength(const AudioFileInfo& info)
 {
     if (info.IsWhole())
         return {};
@@ -74,7 +74,7 @@ std::vector<FileProblem> problemsOfLength(const AudioFileInfo& info)
     return {{"soundIsCut", text, "readers take what is there"}};
 }
 
-std::vector<FileProblem> problemsOf(const std::string& path, const ProblemChecks& checks)
+std::vector<FoundProblem> problemsOf(const std::string& path, const ProblemChecks& checks)
 {
     {
         CAudioFileIO file;

@@ -1,0 +1,23 @@
+// Reads an audio file into a record of an index: described as the other verbs describe it, by the same code.
+#pragma once
+
+#include "tool/shared/library/LibraryRecord.h"
+
+#include <optional>
+
+/// What is read beside the description.
+struct LibraryReading {
+    bool overview = true; // the waveform, which takes all samples
+    bool hash = false;    // of the samples; digests that the file states are compared with them too
+    bool waits = true;    // for programs that hold the file by coordination, for a while; else it is read without
+};
+
+/// The record of the file of a place, which had that stamp when it was found. None for a file that is no audio and is
+/// not called audio, and for one that is no longer there. A file that cannot be read, or is called audio and is none,
+/// gives a record with the state "unreadable" and a problem; "inUse" is the kind of the problem if another program
+/// holds the file.
+///
+/// The stamp of the record belongs to the bytes that were read: a file that kept changing, or is in use, gets one that
+/// no file has, with `inode` and `changed` 0, so that it is read again. Throws std::bad_alloc, nothing else.
+std::optional<LibraryRecord> readLibraryRecord(const FilePlace& place, const SeenStamp& stamp,
+                                               const LibraryReading& wanted);

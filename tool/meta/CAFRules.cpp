@@ -14,7 +14,7 @@
 
 namespace {
 
-constexpr FourCC kInfo = fourCC("info"), kStrings = fourCC("strg"), kCAFMarkers = fourCC("mark");
+constexpr FourCC kInfo = fourCC("info"), kStrings = fourCC("strg"), kMarkersOfCAF = fourCC("mark");
 
 // "info".
 
@@ -77,7 +77,7 @@ std::uint32_t freeTextId(MetaEdit& edit, const CAFStringTable& table)
     for (const CAFStringEntry& entry : table.entries)
         most = std::max<std::uint32_t>(most, entry.id);
     // Markers and regions may have ids without a text.
-    if (const MetaChunk* const chunk = edit.find(kCAFMarkers))
+    if (const MetaChunk* const chunk = edit.find(kMarkersOfCAF))
         if (const auto list = CAFMarkerList::read(chunk->body))
             for (const CAFMarker& marker : list->markers)
                 most = std::max<std::uint32_t>(most, marker.id);
@@ -137,7 +137,7 @@ void setString(MetaEdit& edit, const MetaStep& step)
 
 CAFMarkerList cafMarkersOf(MetaEdit& edit)
 {
-    return valueOf<CAFMarkerList>(edit, kCAFMarkers);
+    return valueOf<CAFMarkerList>(edit, kMarkersOfCAF);
 }
 
 template <class Change>
@@ -151,14 +151,14 @@ void changeCAFMarker(MetaEdit& edit, const MetaStep& step, Change change)
         if (!edit.names(step.name.upTo(0) + ".position"))
             MetaEdit::refuse(step, "a new marker needs its position");
         if (list.missingMarkers != 0)
-            MetaEdit::refuseDamaged(kCAFMarkers);
+            MetaEdit::refuseDamaged(kMarkersOfCAF);
         CAFMarker& marker = list.markers.emplace_back();
         CAFTimecode& none = marker.timecode;
         none.hours = none.minutes = none.seconds = none.frames = std::int8_t{-1};
         none.subFrameSampleOffset = 0xFFFFFFFF;
     }
     change(list, list.markers[*index]);
-    putChunk(edit, kCAFMarkers, list);
+    putChunk(edit, kMarkersOfCAF, list);
 }
 
 void setCAFPosition(MetaEdit& edit, const MetaStep& step)
@@ -212,13 +212,13 @@ void removeCAFMarker(MetaEdit& edit, const MetaStep& step)
     if (!index)
         return;
     if (list.missingMarkers != 0)
-        MetaEdit::refuseDamaged(kCAFMarkers);
+        MetaEdit::refuseDamaged(kMarkersOfCAF);
     list.markers.erase(list.markers.begin() + static_cast<std::ptrdiff_t>(*index));
     edit.itemRemoved(step, 0);
     if (list.markers.empty() && list.behind.empty())
-        edit.remove(*edit.find(kCAFMarkers));
+        edit.remove(*edit.find(kMarkersOfCAF));
     else
-        putChunk(edit, kCAFMarkers, list);
+        putChunk(edit, kMarkersOfCAF, list);
 }
 
 using K = MetaKind;
@@ -235,7 +235,7 @@ constexpr MetaRule kCAFRules[] = {
     {"mark[N].id", K::integer, kUnsigned32, setNumber<&CAFMarker::id>},
     {"mark[N].channel", K::integer, kUnsigned32, setNumber<&CAFMarker::channel>},
     {"mark[N]", K::none, {}, removeCAFMarker},
-    {"mark", K::none, {}, removeChunk<kCAFMarkers>},
+    {"mark", K::none, {}, removeChunk<kMarkersOfCAF>},
 };
 
 } // namespace

@@ -18,17 +18,17 @@ namespace {
 // MP4, APE and ASF that programs call so whatever the system.
 using FieldNames = std::span<const std::string_view>;
 
-constexpr std::string_view kTitles[] = {"=TITLE", "info.INAM", "NAME", "info.title", "cart.title"};
-constexpr std::string_view kArtists[] = {"=ARTIST",     "info.IART", "AUTH",           "info.artist",
-                                         "cart.artist", "=COMPOSER", "bext.originator"};
-constexpr std::string_view kAlbums[] = {"=ALBUM", "info.IPRD", "info.album"};
-constexpr std::string_view kGenres[] = {"=GENRE", "info.IGNR", "info.genre"};
-constexpr std::string_view kComments[] = {"=COMMENT",      "info.ICMT", "bext.description", "info.comment",
-                                          "info.comments", "ANNO",      "COMT[0].text",     "=DESCRIPTION"};
-constexpr std::string_view kDates[] = {"bext.originationDate", "=DATE",     "=RECORDINGDATE", "info.ICRD",
-                                       "info.recorded date",   "info.date", "info.year"};
-constexpr std::string_view kTempos[] = {"=BPM", "=TEMPO", "info.IBPM", "info.tempo"};
-constexpr std::string_view kKeys[] = {"=INITIALKEY", "=KEY", "info.IKEY", "info.key signature"};
+constexpr std::string_view kTitlesFields[] = {"=TITLE", "info.INAM", "NAME", "info.title", "cart.title"};
+constexpr std::string_view kArtistsFields[] = {"=ARTIST",     "info.IART", "AUTH",           "info.artist",
+                                               "cart.artist", "=COMPOSER", "bext.originator"};
+constexpr std::string_view kAlbumsFields[] = {"=ALBUM", "info.IPRD", "info.album"};
+constexpr std::string_view kGenresFields[] = {"=GENRE", "info.IGNR", "info.genre"};
+constexpr std::string_view kCommentsFields[] = {"=COMMENT",      "info.ICMT", "bext.description", "info.comment",
+                                                "info.comments", "ANNO",      "COMT[0].text",     "=DESCRIPTION"};
+constexpr std::string_view kDatesFields[] = {"bext.originationDate", "=DATE",     "=RECORDINGDATE", "info.ICRD",
+                                             "info.recorded date",   "info.date", "info.year"};
+constexpr std::string_view kTemposFields[] = {"=BPM", "=TEMPO", "info.IBPM", "info.tempo"};
+constexpr std::string_view kKeysFields[] = {"=INITIALKEY", "=KEY", "info.IKEY", "info.key signature"};
 
 constexpr std::size_t kMostOfValue = 4096;     // bytes of a value among the fields
 constexpr std::size_t kMostOfFields = 1 << 18; // bytes of all fields
@@ -120,24 +120,26 @@ void addFieldTexts(LibraryRecord& record, std::span<const MetaField> fields)
         std::string LibraryRecord::*member;
         FieldNames names;
         std::size_t most;
-    } kTexts[] = {
-        {&LibraryRecord::title, kTitles, kMostOfLine},        {&LibraryRecord::artist, kArtists, kMostOfLine},
-        {&LibraryRecord::album, kAlbums, kMostOfLine},        {&LibraryRecord::genre, kGenres, kMostOfLine},
-        {&LibraryRecord::comment, kComments, kMostOfComment}, {&LibraryRecord::recorded, kDates, kMostOfLine}};
-    for (const auto& [member, names, most] : kTexts)
+    } kTextColumns[] = {{&LibraryRecord::title, kTitlesFields, kMostOfLine},
+                        {&LibraryRecord::artist, kArtistsFields, kMostOfLine},
+                        {&LibraryRecord::album, kAlbumsFields, kMostOfLine},
+                        {&LibraryRecord::genre, kGenresFields, kMostOfLine},
+                        {&LibraryRecord::comment, kCommentsFields, kMostOfComment},
+                        {&LibraryRecord::recorded, kDatesFields, kMostOfLine}};
+    for (const auto& [member, names, most] : kTextColumns)
         if ((record.*member).empty())
             takeFirst(names, fields, most, [&, member = member](const std::string& text, const MetaField&) {
                 record.*member = text;
                 return true;
             });
     if (!record.tempo)
-        takeFirst(kTempos, fields, kMostOfLine, [&](const std::string& text, const MetaField& field) {
+        takeFirst(kTemposFields, fields, kMostOfLine, [&](const std::string& text, const MetaField& field) {
             record.tempo = tempoOfText(text);
             record.tempoSource = record.tempo ? field.fullName() : "";
             return record.tempo.has_value();
         });
     if (!record.keyNote)
-        takeFirst(kKeys, fields, kMostOfLine, [&](const std::string& text, const MetaField& field) {
+        takeFirst(kKeysFields, fields, kMostOfLine, [&](const std::string& text, const MetaField& field) {
             const auto key = keyOfText(text);
             if (!key)
                 return false;

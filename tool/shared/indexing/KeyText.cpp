@@ -67,7 +67,7 @@ bool takeWord(std::string_view& text, std::string_view word)
 }
 
 /// In semitones.
-std::int64_t takeAccidental(std::string_view& text)
+std::int64_t accidentalTaken(std::string_view& text)
 {
     constexpr std::pair<std::string_view, int> kAccidentals[] = {{"#", 1},  {"♯", 1},  {"sharp", 1},
                                                                  {"b", -1}, {"♭", -1}, {"flat", -1}};
@@ -91,7 +91,7 @@ std::optional<MusicalKey> keyOfName(std::string_view text)
     text.remove_prefix(1);
     MusicalKey key;
     key.note = kLetters[static_cast<std::size_t>(asciiLower(letter) - 'a')];
-    key.note = (key.note + takeAccidental(text) + kSemitones) % kSemitones;
+    key.note = (key.note + accidentalTaken(text) + kSemitones) % kSemitones;
     while (text.starts_with(' ') || text.starts_with('-'))
         text.remove_prefix(1);
     if (text.empty()) {

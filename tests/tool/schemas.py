@@ -14,13 +14,18 @@ def shape_of(arguments):
     """How the arguments ask for JSON, if they do."""
     words = [str(argument) for argument in arguments if isinstance(argument, (str, pathlib.Path))]
     words = words[:words.index("--")] if "--" in words else words
-    return next((SHAPES[word] for word in words if word in SHAPES), None)
+    shape = next((SHAPES[word] for word in words if word in SHAPES), None)
+    return shape or ("lines" if words and words[0] == "index" and name_of(words) == "index-export" else None)
 
 
 def name_of(arguments):
     """The schema of what a command line prints."""
     words = [str(argument) for argument in arguments]
     verb, item = words[0], next((word for word in words[1:] if not word.startswith("-")), "")
+    if verb == "index" and (item == "export" or "--records" in words):
+        return "index-export"
+    if verb == "index" and item == "merge":
+        return "index-merge"
     if verb in ("adm", "info") and "--check" in words:
         return f"{verb}-check"
     if verb == "chunks" and item in OBJECTS or verb == "project" and item in OBJECTS:

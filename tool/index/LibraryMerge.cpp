@@ -1,0 +1,144 @@
+#include "tool/index/LibraryMerge.h"
+
+#include "tool/shared/library/IndexedName.h"
+#include "tool/shared/library/LibraryRecordCheck.h"
+#include "tool/shared/output/Failure.h"
+
+#include <tuple>
+#include <utility>
+
+namespace {
+
+// Short enough that an indexer beside this one waits little, long enough that commits cost little.
+constexpr int kFilesPerTransaction = 1'000;
+
+constexpr std::int64_t kNanoseconds = 1'000'000'000;
+
+// How new something is. A file that is no audio has no time of reading: it was looked at after it changed.
+auto ageOf(const SeenStamp& stamp, std::int64_t indexed, bool isAudio)
+{
+    return std::tuple(isAudio ? indexed : stamp.changed / kNanoseconds, stamp.changed, stamp.modified, stamp.size,
+                      stamp.inode, isAudio);
+}
+
+auto ageOf(const IndexedFile& file)
+{
+    return ageOf(file.stamp, file.indexed, file.row != 0);
+}
+
+// Of two records of one age the one that says more, and of these the later one in the order of their bytes, so that
+// the order of the sources decides nothing.
+bool saysMore(const LibraryRecord& record, const LibraryRecord& than)
+{
+    JsonWriter text, other;
+    writeLibraryRecord(text, record);
+    writeLibraryRecord(other, than);
+    return std::tuple(text.text().size(), text.text()) > std::tuple(other.text().size(), other.text());
+}
+
+} // namespace
+
+LibraryMerge::LibraryMerge(Library& target)
+    : target_(target),
+      writer_(std::in_place, target),
+      known_(target),
+      completed_(target.database(), "UPDATE roots SET completed = ?1 WHERE id = ?2 AND coalesce(completed, 0) < ?1"),
+      folderWords_(target.database(), "SELECT words FROM folders WHERE id = ?")
+{
+}
+
+void LibraryMerge::begin()
+{
+    if (!transaction_)
+        transaction_.emplace(target_.database());
+}
+
+void LibraryMerge::endOfFile()
+{
+    if (++filesInTransaction_ >= kFilesPerTransaction)
+        finish();
+}
+
+void LibraryMerge::finish()
+{
+    if (!transaction_)
+        return;
+    transaction_->commit();
+    transaction_.reset();
+    filesInTransaction_ = 0;
+    counts_.added += pending_.added;
+    counts_.changed += pending_.changed;
+    counts_.same += pending_.same;
+    counts_.passedOver += pending_.passedOver;
+    pending_ = {};
+}
+
+void LibraryMerge::abandon()
+{
+    if (!transaction_)
+        return;
+    transaction_.reset();
+    writer_.emplace(target_);
+    filesInTransaction_ = 0;
+    pending_ = {};
+}
+
+void LibraryMerge::add(const LibraryRoot& root)
+{
+    requireFolderPath(root.path);
+    begin();
+    const std::int64_t row = writer_->addRoot(root.path);
+    if (root.completed)
+        completed_.bind(1, *root.completed).bind(2, row).run();
+}
+
+// Of several roots, one in the other, the outermost gives the most words: the order of the sources decides nothing.
+std::int64_t LibraryMerge::folder(const std::string& path, const std::string& words)
+{
+    if (!path.ends_with(words))
+        throw Failure("the words of a folder are not in its path");
+    const std::int64_t row = writer_->addFolder(path, words);
+    folderWords_.bind(1, row).step();
+    const std::string known = nameOfIndexed(folderWords_.bytes(0));
+    folderWords_.reset();
+    if (known.size() < words.size())
+        writer_->moveFolder(row, path, words);
+    return row;
+}
+
+void LibraryMerge::put(const LibraryRecord& record, const std::string& words, bool isNew)
+{
+    requireSound(record);
+    writer_->put(record, folder(record.place.folder, words));
+    ++(isNew ? pending_.added : pending_.changed);
+}
+
+void LibraryMerge::add(const LibraryRecord& record, const std::string& words)
+{
+    add({record.place, record.stamp, 1, record.indexed, words}, [&] { return record; });
+}
+
+void LibraryMerge::add(const IndexedFile& file, const std::function<LibraryRecord()>& record)
+{
+    begin();
+    const std::optional<IndexedFile> known = known_.find(file.place);
+    const bool isAudio = file.row != 0;
+    if (known && known->folderWords.size() < file.folderWords.size())
+        folder(file.place.folder, file.folderWords);
+    const bool isNewer = !known || ageOf(*known) < ageOf(file);
+    if (isAudio) {
+        const bool isSameAge = known && ageOf(*known) == ageOf(file);
+        const std::optional<LibraryRecord> read = isNewer || isSameAge ? std::optional(record()) : std::nullopt;
+        if (isNewer || (isSameAge && saysMore(*read, known_.record(*known))))
+            put(*read, file.folderWords, !known || known->row == 0);
+        else
+            ++pending_.same;
+    } else {
+        requireFolderPath(file.place.folder);
+        requireFileName(file.place.name);
+        if (isNewer)
+            writer_->passOver(folder(file.place.folder, file.folderWords), file.place.name, file.stamp);
+        ++pending_.passedOver;
+    }
+    endOfFile();
+}

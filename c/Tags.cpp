@@ -8,7 +8,6 @@
 
 #include <charconv>
 #include <map>
-#include <set>
 #include <span>
 
 using platform::Value;
@@ -69,9 +68,8 @@ Value valueOf(const LoopTagField& field, const std::vector<const char*>& texts)
     const auto one = [&](std::string_view text) { return isNumber ? numberOrText(text) : Value(std::string(text)); };
     if (field.kind == Kind::number || field.kind == Kind::text)
         return one(texts.front());
-    const std::set<std::string_view> each(texts.begin(), texts.end()); // files keep lists in this order
     platform::Array list;
-    for (const std::string_view text : each)
+    for (const std::string_view text : texts)
         list.push_back(one(text));
     return list;
 }

@@ -37,7 +37,7 @@ def _assignments(values: Mapping[str, Any]) -> Dict[str, Any]:
             if mode or value is None:
                 made["keyType"] = mode or None
         elif name == "descriptors" and isinstance(value, (list, tuple, set, frozenset)):
-            made[name] = sorted({str(each) for each in value}, key=str.encode)  # as the files have them
+            made[name] = [str(each) for each in value]
         else:
             made[name] = value
     return made

@@ -11,11 +11,11 @@ namespace platform {
 
 /// Owner, permissions and times of an open file.
 struct FileAttributes {
-    std::uint32_t owner = 0,       // number of the user
-        group = 0;                 // number of the group
+    std::uint32_t owner = 0;       // number of the user
+    std::uint32_t group = 0;       // number of the group
     std::uint32_t permissions = 0; // the low 12 mode bits
-    FileTime accessed,             // when the content was last read
-        modified;                  // when the content last changed
+    FileTime accessed;             // when the content was last read
+    FileTime modified;             // when the content last changed
 };
 
 // On failure errno says why.

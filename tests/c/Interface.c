@@ -413,7 +413,8 @@ static int seeText(void* context, const char* name, const char* value)
 static void checkTags(const char* media, const char* wave)
 {
     const ktf_text_pair pairs[] = {{"beatCount", "3"},     {"midiRootNote", "F#"},   {"title", "A test"},
-                                   {"descriptors", "Dry"}, {"descriptors", "Clean"}, {"genre", NULL}};
+                                   {"descriptors", "Dry"}, {"descriptors", "Clean"}, {"descriptors", "Dry"},
+                                   {"genre", NULL}};
     const ktf_text_pair unknown = {"beats", "4"}, impossible = {"beatCount", "many"}, nameless = {NULL, "4"};
     const ktf_text_pair twice[] = {{"title", "A"}, {"title", "B"}};
     const char* const loop = copyOf(media, "bassline.aiff");

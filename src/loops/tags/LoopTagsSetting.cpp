@@ -60,6 +60,27 @@ bool areTransients(const platform::Array& list)
     return true;
 }
 
+// Transients by their frames; texts by their bytes, each once.
+void sortAsFilesHaveIt(platform::Array& list, LoopTagField::Kind kind)
+{
+    if (kind == LoopTagField::Kind::transients) {
+        std::ranges::stable_sort(list, {}, [](const Value& each) {
+            const auto transient = transientOf(each);
+            return transient ? transient->frame() : 0;
+        });
+        return;
+    }
+    const auto textOf = [](const Value& each) {
+        const auto* const text = each.get<std::string>();
+        return text != nullptr ? std::string_view(*text) : std::string_view();
+    };
+    std::ranges::stable_sort(list, {}, textOf);
+    const auto repeated = std::ranges::unique(list, [&](const Value& a, const Value& b) {
+        return a.get<std::string>() != nullptr && b.get<std::string>() != nullptr && textOf(a) == textOf(b);
+    });
+    list.erase(repeated.begin(), repeated.end());
+}
+
 bool isPossible(const LoopTagAssignment& assignment)
 {
     const LoopTagField& field = *assignment.field;
@@ -240,11 +261,8 @@ std::optional<LoopTagAssignment> loopTagAssignment(std::string_view name, platfo
     if (const auto* const word = assignment.value.get<std::string>())
         if (const auto number = numberOfWord(*field, *word))
             assignment.value = *number;
-    if (auto* const list = assignment.value.get<platform::Array>(); list != nullptr && field->key == nullptr)
-        std::ranges::stable_sort(*list, {}, [](const Value& each) {
-            const auto transient = transientOf(each);
-            return transient ? transient->frame() : 0;
-        });
+    if (auto* const list = assignment.value.get<platform::Array>(); list != nullptr)
+        sortAsFilesHaveIt(*list, field->kind);
     if (isPossible(assignment))
         return assignment;
     failForValue(error, *field);

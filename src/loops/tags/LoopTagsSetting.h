@@ -10,8 +10,9 @@
 
 /// The assignment of a value to the tag of that name in loopTagFields; null clears it. A number is one from `least` to
 /// `most`, or a text that stands for it: a key such as "F#" or "Bb", a mode such as "minor". A text is UTF-8, a list an
-/// array of such texts. Transients are an array of frames, in any order, each of them a number or an array of the frame
-/// and its type. None for a name that is unknown, and for a value that the tag can never have.
+/// array of such texts, in any order and perhaps repeated. Transients are an array of frames, in any order, each of
+/// them a number or an array of the frame and its type. None for a name that is unknown, and for a value that the tag
+/// can never have.
 KT_EXPORT std::optional<LoopTagAssignment> loopTagAssignment(std::string_view name, platform::Value value,
                                                              platform::Error* error = nullptr);
 

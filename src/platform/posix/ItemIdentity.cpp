@@ -1,5 +1,7 @@
 #include "platform/posix/ItemIdentity.h"
 
+#include "platform/posix/ItemKind.h"
+
 #include <cstddef>
 #include <cstring>
 
@@ -11,20 +13,6 @@
 namespace platform {
 
 namespace {
-
-FileKind kindOf(unsigned mode)
-{
-    switch (mode & S_IFMT) {
-    case S_IFREG:
-        return FileKind::file;
-    case S_IFDIR:
-        return FileKind::directory;
-    case S_IFLNK:
-        return FileKind::symbolicLink;
-    default:
-        return FileKind::other;
-    }
-}
 
 void readHandle(const char* path, ItemIdentity& identity)
 {
@@ -48,7 +36,7 @@ std::optional<ItemIdentity> itemIdentity(const char* path)
     if (statx(AT_FDCWD, path, AT_SYMLINK_NOFOLLOW | AT_NO_AUTOMOUNT, STATX_TYPE | STATX_INO | STATX_BTIME, &found) != 0)
         return std::nullopt;
     ItemIdentity identity;
-    identity.kind = kindOf(found.stx_mode);
+    identity.kind = kindOfMode(found.stx_mode);
     identity.device = makedev(found.stx_dev_major, found.stx_dev_minor);
     identity.inode = found.stx_ino;
     if ((found.stx_mask & STATX_BTIME) != 0) {

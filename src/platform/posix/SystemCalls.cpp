@@ -1,6 +1,7 @@
 #include "platform/SystemCalls.h"
 
 #include "platform/core/ASCIICase.h"
+#include "platform/posix/ItemKind.h"
 
 #include <algorithm>
 #include <cerrno>
@@ -41,27 +42,13 @@ int openPath(const char* path, int flags, Links links)
     return static_cast<int>(syscall(SYS_openat2, AT_FDCWD, path, &how, sizeof how));
 }
 
-FileKind fileKind(mode_t mode)
-{
-    switch (mode & S_IFMT) {
-    case S_IFREG:
-        return FileKind::file;
-    case S_IFDIR:
-        return FileKind::directory;
-    case S_IFLNK:
-        return FileKind::symbolicLink;
-    default:
-        return FileKind::other;
-    }
-}
-
 FileStatus fileStatus(const struct stat& from)
 {
     FileStatus status;
     status.device = from.st_dev;
     status.inode = from.st_ino;
     status.size = from.st_size;
-    status.kind = fileKind(from.st_mode);
+    status.kind = kindOfMode(from.st_mode);
     status.permissions = from.st_mode & 07777;
     status.changed = std::int64_t{from.st_ctim.tv_sec} * 1'000'000'000 + from.st_ctim.tv_nsec;
     status.links = from.st_nlink;

@@ -61,7 +61,8 @@ CREATE TABLE files(
     album TEXT,
     comment TEXT,
     recorded TEXT,                -- when, as the file says it
-    sound_hash TEXT               -- SHA-256 of the samples as stored, in hexadecimal
+    sound_hash TEXT,              -- SHA-256 of the samples as stored, in hexadecimal
+    copied INTEGER NOT NULL DEFAULT 0 -- 1: another file has the same hash; kept by triggers
 );
 -- All files that were looked at, audio or not, as they were then: what is the same is not read again.
 CREATE TABLE seen(
@@ -92,13 +93,24 @@ CREATE TABLE details(
     fields TEXT,                  -- an array of objects with name, value, and perhaps words
     tags TEXT                     -- an object
 );
-CREATE INDEX files_by_folder ON files(folder);
-CREATE INDEX files_by_tempo ON files(tempo) WHERE tempo IS NOT NULL;
-CREATE INDEX files_by_key ON files(key_note, mode, tempo) WHERE key_note IS NOT NULL;
-CREATE INDEX files_by_duration ON files(duration_seconds);
-CREATE INDEX files_by_category ON files(category, tempo) WHERE category IS NOT NULL;
+-- Each order of a search has an index that ends with it, and each number or name that it asks for one that begins with
+-- it; the row stands behind all.
+CREATE INDEX files_by_folder ON files(folder, name);
+CREATE INDEX files_by_name ON files(name);
+CREATE INDEX files_by_size ON files(size);
 CREATE INDEX files_by_modified ON files(modified);
+CREATE INDEX files_by_tempo ON files(tempo);
+CREATE INDEX files_by_key ON files(key_note, mode, tempo);
+CREATE INDEX files_by_duration ON files(duration_seconds);
+CREATE INDEX files_by_category ON files(category, tempo);
+CREATE INDEX files_by_rate ON files(sample_rate);
+-- There are few forms; whoever asks for a kind, container, number of channels or rate looks through all of them.
+CREATE INDEX files_by_form ON files(
+    coalesce(kind, '') || char(9) || coalesce(container_name, '') || char(9) || coalesce(channels, '') || char(9) ||
+    coalesce(sample_rate, ''));
+CREATE INDEX files_by_state ON files(state) WHERE state <> 'whole';
 CREATE INDEX files_by_sound ON files(sound_hash) WHERE sound_hash IS NOT NULL;
+CREATE INDEX copied_files ON files(sound_hash) WHERE copied = 1;
 CREATE INDEX findings_by_file ON findings(file);
 CREATE INDEX findings_by_kind ON findings(kind, file);
 
@@ -116,11 +128,13 @@ CREATE TRIGGER file_added AFTER INSERT ON files BEGIN
     INSERT INTO search(rowid, name, folder, title, artist, album, comment, words)
         SELECT id, name, folder, title, artist, album, comment, words FROM search_texts WHERE id = new.id;
 END;
-CREATE TRIGGER file_changing BEFORE UPDATE ON files BEGIN
+CREATE TRIGGER file_changing BEFORE UPDATE OF
+    folder, name, title, artist, album, comment, category, sub_category, genre, descriptors, key ON files BEGIN
     INSERT INTO search(search, rowid, name, folder, title, artist, album, comment, words)
         SELECT 'delete', id, name, folder, title, artist, album, comment, words FROM search_texts WHERE id = old.id;
 END;
-CREATE TRIGGER file_changed AFTER UPDATE ON files BEGIN
+CREATE TRIGGER file_changed AFTER UPDATE OF
+    folder, name, title, artist, album, comment, category, sub_category, genre, descriptors, key ON files BEGIN
     INSERT INTO search(rowid, name, folder, title, artist, album, comment, words)
         SELECT id, name, folder, title, artist, album, comment, words FROM search_texts WHERE id = new.id;
 END;
@@ -141,6 +155,20 @@ CREATE TRIGGER folder_moved AFTER UPDATE OF words ON folders BEGIN
         SELECT s.id, s.name, s.folder, s.title, s.artist, s.album, s.comment, s.words
         FROM files f JOIN search_texts s ON s.id = f.id WHERE f.folder = new.id;
 END;
+CREATE TRIGGER sound_added AFTER INSERT ON files WHEN new.sound_hash IS NOT NULL BEGIN
+    UPDATE files SET copied = 1 WHERE sound_hash = new.sound_hash AND copied = 0 AND
+        EXISTS (SELECT 1 FROM files o WHERE o.sound_hash = new.sound_hash AND o.id <> new.id);
+END;
+CREATE TRIGGER sound_changed AFTER UPDATE OF sound_hash ON files WHEN old.sound_hash IS NOT new.sound_hash BEGIN
+    UPDATE files SET copied = 0 WHERE sound_hash = old.sound_hash AND
+        NOT EXISTS (SELECT 1 FROM files o WHERE o.sound_hash = old.sound_hash AND o.id <> files.id);
+    UPDATE files SET copied = EXISTS (SELECT 1 FROM files o WHERE o.sound_hash = new.sound_hash AND o.id <> new.id)
+        WHERE id = new.id OR sound_hash = new.sound_hash;
+END;
+CREATE TRIGGER sound_gone AFTER DELETE ON files WHEN old.copied = 1 BEGIN
+    UPDATE files SET copied = 0 WHERE sound_hash = old.sound_hash AND
+        NOT EXISTS (SELECT 1 FROM files o WHERE o.sound_hash = old.sound_hash AND o.id <> files.id);
+END;
 
 -- For people with the shell of SQLite.
 CREATE VIEW loops AS SELECT
@@ -157,8 +185,7 @@ CREATE VIEW problems AS SELECT
 CREATE VIEW duplicates AS SELECT
     f.sound_hash AS sound_hash, d.path || f.name AS path, f.size AS size
     FROM files f JOIN folders d ON d.id = f.folder
-    WHERE EXISTS (SELECT 1 FROM files o WHERE o.sound_hash = f.sound_hash AND o.id <> f.id)
-    ORDER BY f.sound_hash, path;
+    WHERE f.copied = 1 ORDER BY f.sound_hash, path;
 CREATE VIEW fields AS SELECT
     d.path || f.name AS path, json_extract(e.value, '$.name') AS name, json_extract(e.value, '$.value') AS value,
     json_extract(e.value, '$.words') AS words

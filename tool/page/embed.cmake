@@ -1,0 +1,16 @@
+# Writes a C++ source that holds the sources of the page: cmake -DOUT=… -DFOLDER=… -P embed.cmake
+set(document page.html)
+set(style page.css)
+set(script rows.js waves.js table.js player.js main.js)
+
+set(source "#include \"tool/page/PageSources.h\"\n\nnamespace pagesources {\n\n")
+foreach(part document style script)
+    set(text "")
+    foreach(file IN LISTS ${part})
+        file(READ "${FOLDER}/${file}" content)
+        string(APPEND text "${content}")
+    endforeach()
+    string(APPEND source "const std::string_view ${part} = R\"page(${text})page\";\n")
+endforeach()
+string(APPEND source "\n} // namespace pagesources\n")
+file(WRITE "${OUT}" "${source}")

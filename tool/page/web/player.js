@@ -70,6 +70,7 @@ class Player {
         const isCurrent = index === this.index, note = this.noteOf(row);
         return {
             note,
+            wrong: Boolean(row.more.gone || row.more.problem || this.notes.has(index)),
             mute: note !== "",
             playing: isCurrent && note === "",
             sounding: isCurrent && !this.audio.paused,

@@ -17,7 +17,7 @@ function tempoText(tempo) {
 }
 
 class Table {
-    /** `actions` has play(index), seek(index, fraction), stateOf(index): {note, mute, playing, sounding, played}. */
+    /** `actions` has play(index), seek(index, fraction), stateOf(index): {note, wrong, mute, playing, sounding, played}. */
     constructor(rows, actions) {
         this.rows = rows;
         this.actions = actions;
@@ -152,7 +152,7 @@ class Table {
         const state = this.actions.stateOf(element.index, element.row);
         element.state = state;
         element.folder.textContent = element.folder.title = [state.note, element.row.folder].filter(Boolean).join(" · ");
-        element.root.classList.toggle("noted", Boolean(state.note));
+        element.root.classList.toggle("noted", state.wrong);
         element.root.classList.toggle("mute", state.mute);
         element.root.classList.toggle("playing", state.playing);
         element.root.classList.toggle("sounding", state.sounding);

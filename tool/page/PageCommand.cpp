@@ -130,7 +130,7 @@ void declarePage(CommandLine& commandLine)
     addQueryOptions(verb, arguments.query);
     verb.setHeading("The page");
     CommandLine::addPath(verb, "-o,--output", arguments.out, "The page to write, \"-\" for standard output").label("OUT");
-    verb.addText("--title", arguments.title, "Its heading; else the name of the folder with all sounds").label("TEXT");
+    verb.addText("--heading", arguments.title, "Its heading; else the name of the folder with all sounds").label("TEXT");
     const Argument previews =
         verb.addFlag("--previews", arguments.makesPreviews,
                      "Write previews, 10 seconds at most, beside it for what some browsers do not play");

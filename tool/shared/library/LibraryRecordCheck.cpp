@@ -15,10 +15,10 @@ namespace {
 
 constexpr std::size_t kLongestFolderPath = 65'536; // paths of open folders are not bounded by PATH_MAX
 constexpr std::size_t kLongestFileName = 1'024;
-constexpr std::size_t kMostPoints = 1 << 17; // 30 seconds at a million frames per second, 256 frames per point
+constexpr std::size_t kMostKeptPoints = 1 << 17; // 30 seconds at a million frames per second, 256 frames per point
 constexpr std::int64_t kFewestFramesPerPoint = 256;
 constexpr std::int64_t kMostFramesPerPoint = std::int64_t{1} << 40;
-constexpr std::size_t kMostProblems = 10'000;
+constexpr std::size_t kMostKeptProblems = 10'000;
 constexpr std::int64_t kSecondsOfDay = 86'400; // clocks of machines differ
 
 bool isWellFormed(std::string_view text)
@@ -81,7 +81,7 @@ void requireTexts(const LibraryRecord& record)
     for (const LibraryColumn& column : libraryColumns())
         if (const auto* const text = std::get_if<LibraryRecord::Text LibraryRecord::*>(&column.member))
             requireThat(isWellFormed(record.**text), column.key);
-    requireThat(record.problems.size() <= kMostProblems, "problems");
+    requireThat(record.problems.size() <= kMostKeptProblems, "problems");
     for (const LibraryProblem& problem : record.problems)
         requireThat(!problem.kind.empty() && isWellFormed(problem.kind) && isWellFormed(problem.text), "problems");
     requireThat(isWellFormed(record.fields), "fields");
@@ -96,7 +96,7 @@ void requireOverview(const LibraryRecord& record)
     const std::size_t count = record.overview->points.size() / 2;
     requireThat(each >= kFewestFramesPerPoint && each <= kMostFramesPerPoint && (each & (each - 1)) == 0,
                 "overview.framesPerPoint");
-    requireThat(record.overview->points.size() % 2 == 0 && count <= kMostPoints, "overview.points");
+    requireThat(record.overview->points.size() % 2 == 0 && count <= kMostKeptPoints, "overview.points");
     if (record.frames)
         requireThat(static_cast<std::int64_t>(count) <= *record.frames / each + 1, "overview.points");
 }

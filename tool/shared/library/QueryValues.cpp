@@ -12,7 +12,7 @@
 
 namespace {
 
-std::string_view trimmed(std::string_view text)
+std::string_view withoutSpace(std::string_view text)
 {
     const std::size_t start = std::min(text.find_first_not_of(" \t"), text.size());
     return text.substr(start, text.find_last_not_of(" \t") + 1 - start);
@@ -33,11 +33,11 @@ struct Unit {
 // The longest name that ends the text counts.
 std::optional<double> numberWithUnit(std::string_view text, std::span<const Unit> units)
 {
-    const std::string lowered = lower(trimmed(text));
+    const std::string lowered = lower(withoutSpace(text));
     for (const Unit& unit : units)
         if (lowered.ends_with(unit.name))
             if (const auto number = plainNumberFromText(
-                    trimmed(std::string_view(lowered).substr(0, lowered.size() - unit.name.size()))))
+                    withoutSpace(std::string_view(lowered).substr(0, lowered.size() - unit.name.size()))))
                 return *number * unit.factor;
     return std::nullopt;
 }
@@ -155,7 +155,7 @@ std::optional<double> plainNumberFromText(std::string_view text)
 std::optional<double> secondsFromText(std::string_view text)
 {
     constexpr Unit kUnits[] = {{"ms", 0.001}, {"min", 60}, {"sec", 1}, {"s", 1}, {"m", 60}, {"h", 3600}};
-    const std::string plain(trimmed(text));
+    const std::string plain(withoutSpace(text));
     if (const auto seconds = timeFromText(plain))
         return seconds;
     return numberWithUnit(plain, kUnits);
@@ -171,14 +171,14 @@ std::optional<double> rateFromText(std::string_view text)
 
 std::optional<NumberRange> rangeFromText(std::string_view text, const NumberReader& read)
 {
-    text = trimmed(text);
+    text = withoutSpace(text);
     const std::size_t dots = text.find("..");
     if (dots == text.npos) {
         const auto number = read(text);
         return number ? std::optional(NumberRange{*number, *number}) : std::nullopt;
     }
     NumberRange range;
-    const std::string_view first = trimmed(text.substr(0, dots)), last = trimmed(text.substr(dots + 2));
+    const std::string_view first = withoutSpace(text.substr(0, dots)), last = withoutSpace(text.substr(dots + 2));
     if (!first.empty()) {
         const auto least = read(first);
         if (!least)
@@ -210,7 +210,7 @@ std::optional<KeyChoice> keyFromText(std::string_view text)
 {
     constexpr std::string_view kLetters = "c d ef g a b"; // at their semitones
     constexpr int kNotes = 12;
-    text = trimmed(text);
+    text = withoutSpace(text);
     if (text.empty())
         return std::nullopt;
     if (const auto mode = modeFromText(text); mode && text.size() > 1) // "m" alone says too little
@@ -222,7 +222,7 @@ std::optional<KeyChoice> keyFromText(std::string_view text)
     const int note = (static_cast<int>(semitones) + takeAccidental(text) + kNotes) % kNotes;
     if (text.starts_with('-') || text.starts_with('_'))
         text.remove_prefix(1);
-    const auto mode = modeFromText(trimmed(text));
+    const auto mode = modeFromText(withoutSpace(text));
     return mode ? std::optional(KeyChoice{note, *mode}) : std::nullopt;
 }
 
@@ -233,7 +233,7 @@ std::optional<std::int64_t> sinceFromText(std::string_view text)
                               {"d", kDay},           {"weeks", 7 * kDay},  {"week", 7 * kDay},    {"w", 7 * kDay},
                               {"months", 30 * kDay}, {"month", 30 * kDay}, {"years", 365 * kDay}, {"year", 365 * kDay},
                               {"y", 365 * kDay}};
-    text = trimmed(text);
+    text = withoutSpace(text);
     if (equalIgnoringASCIICase(text, "today"))
         return daysAgo(0);
     if (equalIgnoringASCIICase(text, "yesterday"))

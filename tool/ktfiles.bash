@@ -46,10 +46,10 @@ _ktfiles()
     esac
 
     if ((cword == 1)); then
-        COMPREPLY=($(compgen -W 'info pair chunks tags meta scan overview adm project lock locks decode help --help --version -V' -- "$cur"))
+        COMPREPLY=($(compgen -W 'info pair chunks tags meta scan page overview adm project lock locks decode help --help --version -V' -- "$cur"))
     elif [[ $verb == help ]]; then
         if ((cword == 2)); then
-            COMPREPLY=($(compgen -W 'info pair chunks tags meta scan overview adm project lock locks decode' -- "$cur"))
+            COMPREPLY=($(compgen -W 'info pair chunks tags meta scan page overview adm project lock locks decode' -- "$cur"))
         elif ((cword == 3)) && [[ $object == chunks ]]; then
             COMPREPLY=($(compgen -W 'get add remove' -- "$cur"))
         elif ((cword == 3)) && [[ $object == tags ]]; then
@@ -73,6 +73,9 @@ _ktfiles()
                 --force --threads $files $common" -- "$cur")) ;;
             lock/*) COMPREPLY=($(compgen -W "--read --write --presenter --timeout -- $common" -- "$cur")) ;;
             scan/*) COMPREPLY=($(compgen -W "--csv --threads $files $common" -- "$cur")) ;;
+            page/*) COMPREPLY=($(compgen -W "--tempo --key --related --kind --category --genre --artist --title --album --longer --shorter
+                --rate --channels --format --problem --duplicates --since --sort --reverse --limit
+                --output --heading --previews --embed-previews --force --db $common" -- "$cur")) ;;
             meta/set) COMPREPLY=($(compgen -W "--lenient --loudness --md5 $files $edit $common" -- "$cur")) ;;
             meta/remove) COMPREPLY=($(compgen -W "$files $edit $common" -- "$cur")) ;;
             meta/copy) COMPREPLY=($(compgen -W "--only --lenient $files $edit $common" -- "$cur")) ;;

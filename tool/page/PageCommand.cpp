@@ -53,7 +53,9 @@ std::string folderOf(const std::string& out)
 PagePreviews previewsFor(const PageArguments& arguments, bool quiet)
 {
     using Where = PagePreviews::Where;
-    return {.where = arguments.embedsPreviews ? Where::embedded : arguments.makesPreviews ? Where::beside : Where::none,
+    return {.where = arguments.embedsPreviews  ? Where::embedded
+                     : arguments.makesPreviews ? Where::beside
+                                               : Where::none,
             .page = arguments.out,
             .quiet = quiet};
 }
@@ -128,9 +130,10 @@ void declarePage(CommandLine& commandLine)
     Verb& verb = commandLine.addVerb("page", "Write a page on which a library is looked at and listened to",
                                      [&commandLine] { return runPage(arguments, commandLine.output()); });
     addQueryOptions(verb, arguments.query);
-    verb.setHeading("The page");
-    CommandLine::addPath(verb, "-o,--output", arguments.out, "The page to write, \"-\" for standard output").label("OUT");
-    verb.addText("--heading", arguments.title, "Its heading; else the name of the folder with all sounds").label("TEXT");
+    CommandLine::addPath(verb, "-o,--output", arguments.out, "The page to write, \"-\" for standard output")
+        .label("OUT");
+    verb.addText("--heading", arguments.title, "Its heading; else the name of the folder with all sounds")
+        .label("TEXT");
     const Argument previews =
         verb.addFlag("--previews", arguments.makesPreviews,
                      "Write previews, 10 seconds at most, beside it for what some browsers do not play");

@@ -112,7 +112,10 @@ public:
 
 private:
     // Folders are shown from the one on that all sounds are in.
-    static std::size_t aboveOf(std::string_view folder) { return folder.size() - std::min(folder.size(), lastComponent(folder).size() + 1); }
+    static std::size_t aboveOf(std::string_view folder)
+    {
+        return folder.size() - std::min(folder.size(), lastComponent(folder).size() + 1);
+    }
 
     void write(const PageRow& row)
     {
@@ -127,7 +130,8 @@ private:
             writeText(*text);
         json_.write(row.wave);
         writeMore(json_, row,
-                  needsBytes(row.place.name, shown) && !page_.isServed ? percentEncoded(row.place.name) : std::string());
+                  needsBytes(row.place.name, shown) && !page_.isServed ? percentEncoded(row.place.name)
+                                                                       : std::string());
         json_.endArray();
     }
     void writeText(const std::string& text) { json_.write(texts_.numberOf(text)); }

@@ -7,8 +7,8 @@
 #include <vector>
 
 struct PageDocument {
-    std::string title; // empty: the name of the folder that all sounds are in
-    std::string folder; // where the page will be: absolute, with a slash at the end
+    std::string title;     // empty: the name of the folder that all sounds are in
+    std::string folder;    // where the page will be: absolute, with a slash at the end
     bool isServed = false; // by a server that gives sounds by the numbers of their rows
 
     /// The whole file.

@@ -10,7 +10,8 @@ std::string percentEncoded(std::string_view path)
     constexpr std::string_view plain = "-._~/";
     std::string text;
     for (const char byte : path) {
-        const bool isWord = (byte >= 'a' && byte <= 'z') || (byte >= 'A' && byte <= 'Z') || (byte >= '0' && byte <= '9');
+        const bool isWord =
+            (byte >= 'a' && byte <= 'z') || (byte >= 'A' && byte <= 'Z') || (byte >= '0' && byte <= '9');
         if (isWord || plain.find(byte) != plain.npos)
             text += byte;
         else

@@ -65,9 +65,10 @@ void requireRoom(const std::vector<PageRow>& rows)
             ++count;
         }
     if (bytes > kMostEmbeddedBytes)
-        throw Failure(fmt::format("the previews of {} sounds would take {:.0f} MB, and {:.0f} MB at most are put into a "
-                                  "page: --previews writes them beside it",
-                                  count, bytes / 1e6, kMostEmbeddedBytes / 1e6));
+        throw Failure(
+            fmt::format("the previews of {} sounds would take {:.0f} MB, and {:.0f} MB at most are put into a "
+                        "page: --previews writes them beside it",
+                        count, bytes / 1e6, kMostEmbeddedBytes / 1e6));
 }
 
 } // namespace
@@ -96,7 +97,8 @@ bool PagePreviews::make(std::vector<PageRow>& rows) const
     if (where == Where::beside)
         makeFolder(folder);
     prepareOutputFiles();
-    const FileLoop loop{.threads = std::min(threadsFor(0), kMostTemporaryFiles), .doing = "making previews", .quiet = quiet};
+    const FileLoop loop{
+        .threads = std::min(threadsFor(0), kMostTemporaryFiles), .doing = "making previews", .quiet = quiet};
     const auto start = [&](const FoundFile& file) -> FileRest {
         PageRow& row = *rowOf.at(file.path);
         WaveStream stream(file.path, kPreviewLimits);

@@ -75,8 +75,8 @@ std::string WaveStream::read(std::int64_t offset, std::size_t wanted)
     if (offset < kHeaderSize)
         return header().substr(static_cast<std::size_t>(offset), wanted);
     const std::int64_t behind = offset - kHeaderSize, first = behind / frameSize(), skipped = behind % frameSize();
-    const std::int64_t rounded = (static_cast<std::int64_t>(std::min<std::size_t>(wanted, 1 << 20)) + skipped +
-                                  frameSize() - 1) / frameSize();
+    const std::int64_t rounded =
+        (static_cast<std::int64_t>(std::min<std::size_t>(wanted, 1 << 20)) + skipped + frameSize() - 1) / frameSize();
     const std::int64_t count = std::min({rounded, kMostFramesAtOnce, frames_ - first});
     if (count <= 0)
         return {};

@@ -26,6 +26,11 @@ auto ageOf(const IndexedFile& file)
     return ageOf(file.stamp, file.indexed, file.row != 0);
 }
 
+bool areMore(const std::string& words, const std::string& than)
+{
+    return std::tuple(words.size(), words) > std::tuple(than.size(), than);
+}
+
 // Of two records of one age the one that says more, and of these the later one in the order of their bytes, so that
 // the order of the sources decides nothing.
 bool saysMore(const LibraryRecord& record, const LibraryRecord& than)
@@ -92,16 +97,16 @@ void LibraryMerge::add(const LibraryRoot& root)
         completed_.bind(1, *root.completed).bind(2, row).run();
 }
 
-// Of several roots, one in the other, the outermost gives the most words: the order of the sources decides nothing.
+// Words of folders begin with the name of a root, or of a link in one that leads to the folder. Of several, the longest
+// say the most, and the order of the sources decides nothing.
 std::int64_t LibraryMerge::folder(const std::string& path, const std::string& words)
 {
-    if (!path.ends_with(words))
-        throw Failure("the words of a folder are not in its path");
+    requireFolderPath("/" + words);
     const std::int64_t row = writer_->addFolder(path, words);
     folderWords_.bind(1, row).step();
     const std::string known = nameOfIndexed(folderWords_.bytes(0));
     folderWords_.reset();
-    if (known.size() < words.size())
+    if (areMore(words, known))
         writer_->moveFolder(row, path, words);
     return row;
 }
@@ -123,7 +128,7 @@ void LibraryMerge::add(const IndexedFile& file, const std::function<LibraryRecor
     begin();
     const std::optional<IndexedFile> known = known_.find(file.place);
     const bool isAudio = file.row != 0;
-    if (known && known->folderWords.size() < file.folderWords.size())
+    if (known && areMore(file.folderWords, known->folderWords))
         folder(file.place.folder, file.folderWords);
     const bool isNewer = !known || ageOf(*known) < ageOf(file);
     if (isAudio) {

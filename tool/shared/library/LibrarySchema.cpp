@@ -93,6 +93,7 @@ CREATE TABLE details(
     fields TEXT,                  -- an array of objects with name, value, and perhaps words
     tags TEXT                     -- an object
 );
+CREATE INDEX seen_by_inode ON seen(inode) WHERE file IS NOT NULL; -- to find what has moved
 -- Each order of a search has an index that ends with it, and each number or name that it asks for one that begins with
 -- it; the row stands behind all.
 CREATE INDEX files_by_folder ON files(folder, name);

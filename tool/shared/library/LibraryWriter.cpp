@@ -89,6 +89,12 @@ std::int64_t LibraryWriter::addRoot(const std::string& path)
     return find.number(0);
 }
 
+void LibraryWriter::removeRoot(const std::string& path)
+{
+    const std::string text = indexedName(path);
+    SQLStatement(library_.database(), "DELETE FROM roots WHERE path = ?").bind(1, std::string_view(text)).run();
+}
+
 void LibraryWriter::completeRoot(std::int64_t root, std::int64_t seconds)
 {
     SQLStatement(library_.database(), "UPDATE roots SET completed = ? WHERE id = ?")
@@ -108,6 +114,28 @@ std::int64_t LibraryWriter::addFolder(const std::string& path, const std::string
     findFolder_.reset();
     folders_.emplace(path, folder);
     return folder;
+}
+
+std::int64_t LibraryWriter::folderAt(const std::string& path)
+{
+    if (const auto known = folders_.find(path); known != folders_.end())
+        return known->second;
+    const std::string text = indexedName(path);
+    const std::int64_t folder = findFolder_.bind(1, std::string_view(text)).step() ? findFolder_.number(0) : 0;
+    findFolder_.reset();
+    if (folder != 0)
+        folders_.emplace(path, folder);
+    return folder;
+}
+
+void LibraryWriter::removeEmptyFolder(std::int64_t folder)
+{
+    SQLStatement(library_.database(),
+                 "DELETE FROM folders WHERE id = ?1 AND NOT EXISTS (SELECT 1 FROM seen WHERE folder = ?1) "
+                 "AND NOT EXISTS (SELECT 1 FROM files WHERE folder = ?1)")
+        .bind(1, folder)
+        .run();
+    folders_.clear();
 }
 
 std::int64_t LibraryWriter::fileAt(std::int64_t folder, const std::string& name)
@@ -181,12 +209,14 @@ void LibraryWriter::move(std::int64_t folder, const std::string& name, std::int6
     see(newFolder, newName, stamp, file);
 }
 
-void LibraryWriter::remove(std::int64_t folder, const std::string& name)
+bool LibraryWriter::remove(std::int64_t folder, const std::string& name)
 {
     const std::string text = indexedName(name);
-    if (const std::int64_t file = fileAt(folder, name); file != 0)
+    const std::int64_t file = fileAt(folder, name);
+    if (file != 0)
         removeFile_.bind(1, file).run();
     unsee_.bind(1, folder).bind(2, std::string_view(text)).run();
+    return file != 0;
 }
 
 void LibraryWriter::moveFolder(std::int64_t folder, const std::string& path, const std::string& words)

@@ -11,12 +11,23 @@ class LibraryWriter {
 public:
     explicit LibraryWriter(Library& library);
 
+    /// Call at the beginning of each transaction but the first: forgets which rows the folders have, as another program
+    /// may have removed some.
+    void begin() { folders_.clear(); }
+
     /// The row of a root, which is added if it is new. `path` ends with a slash.
     std::int64_t addRoot(const std::string& path);
+    /// Forgets a root, not what is known below it.
+    void removeRoot(const std::string& path);
     /// Notes that a root was gone through to its end.
     void completeRoot(std::int64_t root, std::int64_t seconds);
     /// The row of a folder, which is added if it is new. `words` is the part of its path that a search looks at.
     std::int64_t addFolder(const std::string& path, const std::string& words);
+
+    /// The row of a folder; 0 for none.
+    std::int64_t folderAt(const std::string& path);
+    /// Forgets a folder if nothing is known of what is in it.
+    void removeEmptyFolder(std::int64_t folder);
 
     /// Adds an audio file, or puts it in the place of what was known of the file of that place; the row stays the
     /// same. Returns the row.
@@ -26,8 +37,8 @@ public:
     /// A file has moved: its row goes with it. Nothing else may be known of the new place.
     void move(std::int64_t folder, const std::string& name, std::int64_t newFolder, const std::string& newName,
               const SeenStamp& stamp);
-    /// Forgets what was in a place; nothing if there was none.
-    void remove(std::int64_t folder, const std::string& name);
+    /// Forgets what was in a place; nothing if there was none. Whether it was audio.
+    bool remove(std::int64_t folder, const std::string& name);
     /// A folder has moved with all that is in it.
     void moveFolder(std::int64_t folder, const std::string& path, const std::string& words);
 

@@ -1,0 +1,142 @@
+// ktfiles index: makes the index of a library, and brings it up to date.
+#include "tool/index/EndOfWork.h"
+#include "tool/shared/arguments/CommandLine.h"
+#include "tool/shared/arguments/ThreadsOption.h"
+#include "tool/shared/indexing/LibraryUpdate.h"
+#include "tool/shared/output/Failure.h"
+#include "tool/shared/output/FilesProgress.h"
+#include "tool/shared/output/JsonRecords.h"
+#include "tool/shared/output/ProgressLine.h"
+#include "tool/shared/output/ShownName.h"
+
+#include <charconv>
+#include <optional>
+#include <unistd.h>
+
+namespace {
+
+struct IndexArguments {
+    FileArguments folders;
+    std::string database;
+    bool hashes = false;
+    bool omitsOverviews = false;
+    bool prunes = false;
+    unsigned threads = 0;
+    LibraryShard shard;
+};
+
+std::optional<LibraryShard> shardFromText(const std::string& text)
+{
+    LibraryShard shard;
+    const char* const end = text.data() + text.size();
+    const auto number = std::from_chars(text.data(), end, shard.number);
+    if (number.ec != std::errc() || number.ptr == end || *number.ptr != '/')
+        return std::nullopt;
+    const auto count = std::from_chars(number.ptr + 1, end, shard.count);
+    const bool isWhole = count.ec == std::errc() && count.ptr == end;
+    return isWhole && shard.number >= 1 && shard.number <= shard.count ? std::optional(shard) : std::nullopt;
+}
+
+std::string shardProblem(const std::string& text)
+{
+    return shardFromText(text) ? "" : "\"" + printable(text) + "\" is no part such as 1/4";
+}
+
+// "1,234,567".
+std::string grouped(std::int64_t number)
+{
+    std::string text = std::to_string(number);
+    for (std::size_t at = text.size(); at > 3; at -= 3)
+        text.insert(at - 3, ",");
+    return text;
+}
+
+std::string summary(const LibraryChanges& changes)
+{
+    std::string text =
+        fmt::format("{} added, {} changed, {} moved, {} removed, {} unchanged", grouped(changes.added),
+                    grouped(changes.changed), grouped(changes.moved), grouped(changes.removed), grouped(changes.same));
+    if (changes.unreadable > 0)
+        text += fmt::format(", {} unreadable", grouped(changes.unreadable));
+    return text;
+}
+
+void writeChanges(const LibraryChanges& changes, const std::string& path, const OutputOptions& options)
+{
+    const std::string shown = shownName(path);
+    writeRecord(options, [&](JsonWriter& json) {
+        json.beginObject().member("database", shown);
+        json.member("added", changes.added).member("changed", changes.changed).member("moved", changes.moved);
+        json.member("removed", changes.removed).member("unchanged", changes.same);
+        json.member("passedOver", changes.passedOver).member("unreadable", changes.unreadable);
+        json.member("problems", changes.problems).endObject();
+    });
+}
+
+LibraryUpdate updateFor(const IndexArguments& arguments)
+{
+    LibraryUpdate update;
+    if (!arguments.folders.names.empty() || !arguments.folders.list.empty())
+        update.folders = allNames(arguments.folders);
+    update.reading = {.overview = !arguments.omitsOverviews, .hash = arguments.hashes};
+    update.threads = arguments.threads;
+    update.shard = arguments.shard;
+    update.prunes = arguments.prunes;
+    update.isEnded = EndOfWork::isAsked;
+    update.tell = [](const std::string& path, const std::string& problem) { reportFailure(path, problem); };
+    return update;
+}
+
+LibraryChanges updateIndex(Library& library, LibraryUpdate update, bool quiet)
+{
+    FilesProgress progress("indexing", quiet);
+    update.progress = &progress;
+    return updateLibrary(library, update);
+}
+
+bool runIndex(const IndexArguments& arguments, const OutputOptions& options)
+{
+    LibraryUpdate update;
+    if (!reportingFailures(arguments.folders.listName(), [&] { update = updateFor(arguments); }))
+        return false;
+    const std::string path = arguments.database.empty() ? defaultLibrary() : arguments.database;
+    if (update.folders.empty() && ::access(path.c_str(), F_OK) != 0)
+        throw MissingArgument(arguments.folders.label);
+    std::optional<LibraryChanges> changes;
+    const EndOfWork ending;
+    const bool wasWritten = reportingFailures(path, [&] {
+        Library library(path, SQLDatabase::Mode::create);
+        changes = updateIndex(library, std::move(update), options.quiet);
+    });
+    if (wasWritten && options.wantsJson())
+        writeChanges(*changes, path, options);
+    if (wasWritten && !options.quiet && isTerminal(STDERR_FILENO)) {
+        const progressline::Cleared cleared;
+        fmt::print(stderr, "{}; {}\n", summary(*changes), printable(shownName(path)));
+    }
+    EndOfWork::endIfAsked();
+    return wasWritten && changes->problems == 0;
+}
+
+void declareIndex(CommandLine& commandLine)
+{
+    static IndexArguments arguments;
+    Verb& verb = commandLine.addVerb("index", "Keep an index of the audio files below folders, for find and page",
+                                     [&commandLine] { return runIndex(arguments, commandLine.output()); });
+    CommandLine::addFiles(verb, arguments.folders, "FOLDER")
+        .describe("The folders, and single files; with none, those that were indexed before");
+    CommandLine::addPath(verb, "--db", arguments.database, "The index, in place of the user's own").label("FILE");
+    verb.addFlag("--hash", arguments.hashes, "Hash the sound too, which finds duplicates");
+    verb.addFlag("--no-overview", arguments.omitsOverviews, "Keep no waveforms, for which all samples are read");
+    verb.addFlag("--prune", arguments.prunes, "Forget what lies in folders that are not there, or are empty");
+    const auto takeShard = [](const std::string& text) {
+        arguments.shard = shardFromText(text).value_or(LibraryShard());
+    };
+    verb.addText("--shard", takeShard, "Of N parts of the files, only the one with number I", shardProblem)
+        .label("I/N");
+    addThreads(verb, arguments.threads);
+}
+
+const VerbRegistration indexRegistration{45, "index", declareIndex};
+
+} // namespace

@@ -1,0 +1,125 @@
+#include "tool/shared/indexing/LibraryWalk.h"
+
+#include "tool/shared/threads/StartedThread.h"
+
+#include <algorithm>
+#include <cstdlib>
+#include <memory>
+#include <ranges>
+
+namespace {
+
+std::string resolvedFolder(const std::string& path)
+{
+    const std::unique_ptr<char, decltype(&std::free)> text(::realpath(path.c_str(), nullptr), &std::free);
+    const std::string resolved = text ? text.get() : "";
+    return resolved.empty() || resolved.ends_with('/') ? resolved : resolved + "/";
+}
+
+} // namespace
+
+LibraryWalk::LibraryWalk(UpdateInbox& inbox, std::vector<WalkStart> starts, unsigned threads) : inbox_(inbox)
+{
+    for (WalkStart& start : starts | std::views::reverse) {
+        FolderListing listing;
+        listing.path = start.path;
+        listing.words = start.words;
+        listing.isRoot = start.files.empty();
+        listing.rootLength = start.words.size();
+        if (start.files.empty())
+            roots_.push_back(start.path);
+        tasks_.push_back({std::move(listing), std::move(start.files)});
+    }
+    if (tasks_.empty()) {
+        inbox_.endListings();
+        return;
+    }
+    threads_.reserve(threads);
+    for (unsigned i = 0; i < threads; ++i)
+        if (std::jthread thread = startedThread([this] { work(); }); thread.joinable())
+            threads_.push_back(std::move(thread));
+        else
+            break;
+    if (threads_.empty()) {
+        inbox_.makeBoundless();
+        work();
+    }
+}
+
+LibraryWalk::~LibraryWalk()
+{
+    const std::lock_guard lock(mutex_);
+    isStopped_ = true;
+    ready_.notify_all();
+}
+
+void LibraryWalk::work()
+{
+    std::unique_lock lock(mutex_);
+    for (;;) {
+        ready_.wait(lock, [this] { return isStopped_ || !tasks_.empty() || atWork_ == 0; });
+        if (isStopped_ || tasks_.empty())
+            break;
+        Task task = std::move(tasks_.back());
+        tasks_.pop_back();
+        ++atWork_;
+        lock.unlock();
+        const bool goesOn = visit(task);
+        lock.lock();
+        isStopped_ = isStopped_ || !goesOn;
+        if (--atWork_ == 0 && tasks_.empty()) {
+            inbox_.endListings();
+            ready_.notify_all();
+        }
+    }
+}
+
+bool LibraryWalk::visit(Task& task)
+{
+    FolderListing& listing = task.listing;
+    if (task.files.empty()) {
+        bool isVisited = false;
+        listFolder(listing, [&](const FolderListing& opened) { return !(isVisited = !isNew(opened)); });
+        if (isVisited)
+            return true;
+        addFolders(listing);
+    } else {
+        for (const std::string& name : task.files)
+            if (!listFile(listing, name))
+                listing.missing.push_back(name);
+    }
+    return inbox_.leave(std::move(listing));
+}
+
+void LibraryWalk::addFolders(const FolderListing& listing)
+{
+    std::vector<Task> tasks;
+    for (const ListedFolder& folder : listing.folders | std::views::reverse) {
+        FolderListing next;
+        next.path = listing.path + folder.name + "/";
+        next.words = listing.words + folder.name + "/";
+        next.rootLength = listing.rootLength;
+        if (folder.isLink) {
+            next.path = resolvedFolder(next.path);
+            if (next.path.empty() || leadsInside(next.path))
+                continue;
+        }
+        tasks.push_back({std::move(next), {}});
+    }
+    if (tasks.empty())
+        return;
+    const std::lock_guard lock(mutex_);
+    tasks_.insert(tasks_.end(), std::make_move_iterator(tasks.begin()), std::make_move_iterator(tasks.end()));
+    ready_.notify_all();
+}
+
+bool LibraryWalk::isNew(const FolderListing& listing)
+{
+    const std::lock_guard lock(mutex_);
+    return visited_.emplace(listing.device, listing.inode).second;
+}
+
+bool LibraryWalk::leadsInside(const std::string& path) const
+{
+    return std::ranges::any_of(roots_, [&](const std::string& root) { return path.starts_with(root); });
+}

@@ -1,5 +1,6 @@
 // ktfiles index: makes the index of a library, and brings it up to date.
 #include "tool/index/EndOfWork.h"
+#include "tool/index/IndexObjects.h"
 #include "tool/shared/arguments/CommandLine.h"
 #include "tool/shared/arguments/ThreadsOption.h"
 #include "tool/shared/indexing/LibraryUpdate.h"
@@ -135,6 +136,8 @@ void declareIndex(CommandLine& commandLine)
     verb.addText("--shard", takeShard, "Of N parts of the files, only the one with number I", shardProblem)
         .label("I/N");
     addThreads(verb, arguments.threads);
+    declareIndexMerge(commandLine, verb);
+    declareIndexExport(commandLine, verb);
 }
 
 const VerbRegistration indexRegistration{45, "index", declareIndex};

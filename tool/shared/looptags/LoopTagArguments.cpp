@@ -138,7 +138,10 @@ Value transientsValue(std::string_view text)
     }
     platform::Array transients;
     for (const auto& [frame, type] : types)
-        transients.push_back(type == 1 ? Value(frame) : Value(platform::Array{Value(frame), Value(type)}));
+        if (type == 1)
+            transients.emplace_back(frame);
+        else
+            transients.emplace_back(platform::Array{Value(frame), Value(type)});
     return transients;
 }
 

@@ -1,17 +1,16 @@
 #include "tool/shared/indexing/LibraryFileReader.h"
 
-#include "audiofile/AudioDigest.h"
 #include "audiofile/fields/FileMetadata.h"
 #include "loops/tags/LoopTags.h"
-#include "platform/core/HexText.h"
+#include "platform/core/Status.h"
 #include "tool/shared/access/FileAccess.h"
 #include "tool/shared/description/FileDescription.h"
 #include "tool/shared/description/FoundProblems.h"
 #include "tool/shared/indexing/BoundedText.h"
 #include "tool/shared/indexing/FieldTexts.h"
 #include "tool/shared/indexing/LoopTagColumns.h"
-#include "tool/shared/indexing/OverviewPoints.h"
 #include "tool/shared/indexing/SoundColumns.h"
+#include "tool/shared/indexing/SoundPass.h"
 #include "tool/shared/input/FileLocation.h"
 #include "tool/shared/input/FoundFile.h"
 #include "tool/shared/input/InputFile.h"
@@ -88,10 +87,7 @@ private:
         addSound(record_, file.Info());
         addProblems(file);
         addTags(file);
-        if (wanted_.overview)
-            record_.overview = overviewOf(file);
-        if (wanted_.hash)
-            addHash(file);
+        addSamples(file);
     }
 
     void addProblems(CAudioFileIO& file)
@@ -100,8 +96,7 @@ private:
         if (!problems)
             problems = problemsOfLength(file.Info());
         for (const FoundProblem& problem : *problems)
-            if (record_.problems.size() < kMostProblems)
-                record_.problems.push_back({problem.name, boundedLine(problem.text, kMostOfProblem)});
+            addProblem(problem.name, problem.text);
         record_.state = record_.problems.empty() && file.Info().IsWhole() ? "whole" : "damaged";
     }
 
@@ -118,21 +113,30 @@ private:
         }
     }
 
-    void addHash(CAudioFileIO& file)
+    /// A file whose sound cannot be read has neither waveform nor hash; of linear PCM, that is a problem.
+    void addSamples(CAudioFileIO& file)
     {
-        const AudioFileInfo& info = file.Info();
-        if (info.dataOffset <= 0 || info.dataSize <= 0)
+        if (!wanted_.overview && !wanted_.hash)
             return;
-        platform::Digest sha256(platform::Digest::Kind::sha256);
-        platform::Digest* const digests[] = {&sha256};
-        requireOK(DigestAudio(file, info, digests));
-        record_.soundHash = hexText(sha256.finish());
+        SoundPass pass = passThroughSound(file, path_, {.waveform = wanted_.overview, .hash = wanted_.hash});
+        record_.overview = std::move(pass.waveform);
+        record_.soundHash = std::move(pass.hash);
+        if (pass.status == kStatusOK || file.Info().compressed)
+            return;
+        record_.state = "damaged";
+        addProblem("unreadable", StatusText(pass.status));
+    }
+
+    void addProblem(const char* kind, const std::string& text)
+    {
+        if (record_.problems.size() < kMostProblems)
+            record_.problems.push_back({kind, boundedLine(text, kMostOfProblem)});
     }
 
     void fail(const char* kind, const std::string& text)
     {
         record_.state = "unreadable";
-        record_.problems.push_back({kind, boundedLine(text, kMostOfProblem)});
+        addProblem(kind, text);
     }
 
     const std::string path_;

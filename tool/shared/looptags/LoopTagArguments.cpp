@@ -33,7 +33,7 @@ namespace {
     refuse(fmt::format("{}={}: {} expected", key, printable(value), expected));
 }
 
-std::string_view trimmed(std::string_view text)
+std::string_view spaceless(std::string_view text)
 {
     constexpr const char* kWhite = " \t\r\n\v\f";
     const std::size_t start = std::min(text.find_first_not_of(kWhite), text.size());
@@ -43,7 +43,7 @@ std::string_view trimmed(std::string_view text)
 // A text without white space around it, or the meaning of a quoted one.
 std::string meantText(std::string_view text)
 {
-    text = trimmed(text);
+    text = spaceless(text);
     if (!isQuoted(text))
         return std::string(text);
     std::string meant = takeQuotedText(text);
@@ -57,7 +57,7 @@ std::set<std::string> members(std::string_view text)
 {
     std::set<std::string> each;
     while (!text.empty()) {
-        std::string_view rest = trimmed(text);
+        std::string_view rest = spaceless(text);
         if (isQuoted(rest))
             takeQuotedText(rest);
         const std::size_t end =
@@ -118,7 +118,7 @@ std::string expectedOf(const LoopTagField& field)
 
 Value numberValue(const LoopTagField& field, std::string_view key, std::string_view text)
 {
-    const auto number = numberOf(field, trimmed(text));
+    const auto number = numberOf(field, spaceless(text));
     if (!number || *number < field.least || *number > field.most)
         refuseValue(key, text, expectedOf(field));
     return *number;
@@ -147,7 +147,7 @@ Value transientsValue(std::string_view text)
 
 Value fieldValue(const LoopTagField& field, std::string_view key, std::string_view text)
 {
-    if (trimmed(text).empty())
+    if (spaceless(text).empty())
         return {};
     switch (field.kind) {
     case Kind::number:
@@ -207,7 +207,7 @@ std::vector<LoopTagAssignment> keyParts(std::string_view text, const std::vector
         return {{&mode, *alone}};
     for (std::size_t end = text.size(); end > 0; --end) { // the longest note first: "Bb" is not "B"
         const auto note = numberOf(root, text.substr(0, end));
-        const std::string_view behind = trimmed(text.substr(end));
+        const std::string_view behind = spaceless(text.substr(end));
         const auto type = numberOf(mode, behind);
         if (!note || *note < root.least || *note > root.most || (!behind.empty() && !type) ||
             (type && (*type < mode.least || *type > mode.most)))
@@ -239,10 +239,10 @@ std::vector<LoopTagAssignment> assignmentsOf(std::string_view key, std::string_v
         refuse(fmt::format("there is no tag \"{}\" (a file of that name is \"./{}={}\"){}; tags are {}", printable(key),
                            printable(key), printable(text), suggestion(key), knownKeys()));
     std::vector<LoopTagAssignment> parts;
-    if (!trimmed(text).empty() && isWord(key, "key")) {
-        parts = keyParts(trimmed(text), fields);
-    } else if (!trimmed(text).empty() && isWord(key, "signature")) {
-        parts = signatureParts(trimmed(text), fields);
+    if (!spaceless(text).empty() && isWord(key, "key")) {
+        parts = keyParts(spaceless(text), fields);
+    } else if (!spaceless(text).empty() && isWord(key, "signature")) {
+        parts = signatureParts(spaceless(text), fields);
     } else {
         for (const LoopTagField* field : fields)
             parts.push_back({field, fieldValue(*field, key, text)});

@@ -1,0 +1,19 @@
+// Files with holes: ranges that were never written, and read as zeros.
+#pragma once
+
+#include "platform/OwnedDescriptor.h"
+
+#include <cstdint>
+#include <string>
+
+/// Knows the holes of one file. Owns a descriptor of its own if the file has any to speak of.
+class SparseFile {
+public:
+    explicit SparseFile(const std::string& path);
+
+    /// Where the hole ends that contains so many bytes from `offset` on; `offset` if there is none.
+    std::int64_t endOfHole(std::int64_t offset, std::int64_t bytes);
+
+private:
+    platform::OwnedDescriptor file_;
+};

@@ -10,14 +10,17 @@
 
 namespace {
 
-// Only the user may look into the folder, as with other data of the desktop.
-void makeFolderOf(const std::string& path)
+// Only the user may look into the folder, as with other data of the desktop. A folder that the user names is not made:
+// it may be misspelled, or a volume that is not mounted.
+void prepareFolderOf(const std::string& path)
 {
     namespace fs = std::filesystem;
     const fs::path folder = fs::path(path).parent_path();
-    if (folder.empty() || fs::exists(folder))
-        return;
     std::error_code error;
+    if (folder.empty() || fs::exists(folder, error))
+        return;
+    if (path != defaultLibrary())
+        throw Failure("there is no folder for it");
     fs::create_directories(folder, error);
     if (error)
         throw Failure("its folder cannot be made: " + SystemErrorText(error.value()));
@@ -27,7 +30,7 @@ void makeFolderOf(const std::string& path)
 SQLDatabase opened(const std::string& path, SQLDatabase::Mode mode)
 {
     if (mode == SQLDatabase::Mode::create)
-        makeFolderOf(path);
+        prepareFolderOf(path);
     else if (::access(path.c_str(), F_OK) != 0)
         throw Failure("there is no index; ktfiles index FOLDER makes one");
     return SQLDatabase(path, mode);
@@ -48,8 +51,9 @@ Library::Library(const std::string& path, SQLDatabase::Mode mode) : database_(op
         prepareLibrary(database_); // looks at the version before anything is written
         database_.run("PRAGMA journal_mode = WAL; PRAGMA synchronous = NORMAL; PRAGMA foreign_keys = ON");
     }
-    // Two gigabytes of address space at most: pages are read from the system's cache without a copy.
-    database_.run("PRAGMA mmap_size = 2147483648; PRAGMA cache_size = -65536; PRAGMA temp_store = MEMORY");
+    if (mode == SQLDatabase::Mode::read) // pages come from the system's cache without a copy; two gigabytes at most
+        database_.run("PRAGMA mmap_size = 2147483648");
+    database_.run("PRAGMA cache_size = -65536; PRAGMA temp_store = MEMORY");
 }
 
 std::string libraryColumnNames()

@@ -1,0 +1,305 @@
+"""What an index knows about a file: the same that the other verbs say of it, within bounds, and of whatever file."""
+import base64
+import json
+import os
+import shutil
+import struct
+import subprocess
+import threading
+import unittest
+
+from command import KTFILES, MEDIA, CommandTest, chunk, wave
+
+RIFF_SIZE = 8
+
+
+def id3(**frames):
+    """An ID3v2.3 tag of texts in Latin-1."""
+    body = b""
+    for name, text in frames.items():
+        text = b"\0" + text.encode("latin1")
+        body += name.encode() + struct.pack(">IH", len(text), 0) + text
+    size = len(body)
+    packed = bytes((size >> shift) & 0x7f for shift in (21, 14, 7, 0))
+    return b"ID3\3\0\0" + packed + body
+
+
+def info(**texts):
+    return chunk(b"LIST", b"INFO" + b"".join(chunk(name.encode(), text + b"\0") for name, text in texts.items()))
+
+
+def bext(description=b"", originator=b"", date=b""):
+    return chunk(b"bext", description.ljust(256, b"\0") + originator.ljust(32, b"\0") + bytes(32) + date.ljust(10, b"\0") + bytes(272))
+
+
+def acid(flags=0, root=0, beats=0, tempo=0.0):
+    return chunk(b"acid", struct.pack("<IHHfIHHf", flags, root, 0x8000, 0, beats, 4, 4, tempo))
+
+
+def long_wave(frames, step):
+    """16-bit mono: a slow saw, whose extremes differ from point to point."""
+    samples = b"".join(struct.pack("<h", (i * step) % 65536 - 32768) for i in range(4096)) * (frames // 4096 + 1)
+    fmt = chunk(b"fmt ", struct.pack("<HHIIHH", 1, 1, 48000, 96000, 2, 16))
+    body = b"WAVE" + fmt + chunk(b"data", samples[:frames * 2])
+    return b"RIFF" + struct.pack("<I", len(body)) + body
+
+
+class IndexRecords(CommandTest):
+    def setUp(self):
+        super().setUp()
+        (self.folder / "lib").mkdir()
+
+    def records(self, *options, status=0):
+        """By name, the records of the files below the folder "lib", which are all read."""
+        for index in self.folder.glob("index.db*"):
+            index.unlink()
+        self.run_command("index", "--quiet", "--db", "index.db", *options, "lib", status=status)
+        found = [json.loads(line) for line in self.lines("index", "export", "--db", "index.db")]
+        return {os.path.basename(each["path"]): each for each in found if "root" not in each}
+
+    def make(self, *commands):
+        for command in commands:
+            words = command.split()
+            quiet = ["-v", "error", "-nostdin"] if words[0] == "ffmpeg" else []
+            subprocess.run([words[0], *quiet, *words[1:]], cwd=self.folder / "lib", check=True, capture_output=True)
+
+    def make_library(self):
+        for name in os.listdir(MEDIA):
+            if (MEDIA / name).is_file():
+                shutil.copy(MEDIA / name, self.folder / "lib")
+        tags = "-metadata title=Title -metadata artist=Artist -metadata genre=Genre -metadata comment=Comment"
+        self.make("sox -n -r 44100 -b 16 -c 2 s.wav synth 4411s sine 300", f"ffmpeg -i s.wav {tags} -write_bext 1 m.wav",
+                  f"ffmpeg -i s.wav {tags} -metadata TBPM=121 m.mp3", f"ffmpeg -i s.wav {tags} m.m4a", f"ffmpeg -i s.wav {tags} m.flac",
+                  f"ffmpeg -i s.wav {tags} -write_id3v2 1 m.aiff", f"ffmpeg -i s.wav {tags} m.caf", f"ffmpeg -i s.wav {tags} m.wma",
+                  "ffmpeg -i s.wav -c:a adpcm_ima_wav ima.wav", "ffmpeg -i s.wav -c:a alac alac.caf", "sox s.wav s.au", "sox s.wav s.w64",
+                  "lame --quiet --tt T --ta A --tg Rock s.wav l.mp3", "flac -s -T BPM=99 -T KEY=Gm s.wav -o f.flac",
+                  "oggenc -Q -t T -c INITIALKEY=8B s.wav -o o.ogg", "opusenc --quiet --title T s.wav o.opus", "wavpack -q s.wav -o w.wv")
+        whole = {name: (self.folder / "lib" / name).read_bytes() for name in os.listdir(self.folder / "lib")}
+        damaged = {"cut.wav": whole["s.wav"][:9000], "cut.aiff": whole["m.aiff"][:9000], "cut.caf": whole["m.caf"][:9000],
+                   "cut.mp3": whole["l.mp3"][:900], "cut.flac": whole["f.flac"][:3000], "cut.ogg": whole["o.ogg"][:3000],
+                   "stray.wav": whole["s.wav"] + b"stray bytes", "late.wav": wave(acid(tempo=90), info(INAM=b"late"), size=100),
+                   "acid.wav": wave(acid(flags=2, root=61, beats=8, tempo=120), frames=192000)}
+        for name, content in damaged.items():
+            (self.folder / "lib" / name).write_bytes(content)
+
+    def test_the_index_says_what_the_other_verbs_say(self):
+        self.make_library()
+        records = self.records("--hash", status=1)
+        told = {name: self.answers(name) for name in os.listdir(self.folder / "lib")}
+        self.assertEqual(sorted(records), sorted(name for name, answers in told.items() if "error" not in answers["info"] or name == "cut.ogg"))
+        self.assertGreater(len(records), 35)
+        for name, record in records.items():
+            with self.subTest(name=name):
+                self.compare(record, **told[name])
+
+    def answers(self, name):
+        path = "lib/" + name
+        info = ["info", "--sha256"] if name.endswith((".wav", ".aiff", ".aifc", ".caf", ".au", ".w64")) else ["info"]
+        return {"info": self.record(*info, path, status=None), "check": self.record("info", "--check", path, status=None),
+                "tags": self.record("tags", path, status=None), "meta": self.record("meta", path, status=None),
+                "overview": self.record("overview", path, status=None)}
+
+    def compare(self, record, info, check, tags, meta, overview):
+        if "error" in info:
+            self.assertEqual((record["state"], record["problems"]), ("unreadable", [{"kind": "unreadable", "text": info["error"]}]))
+            return
+        for key in ("containerName", "fileType", "coding", "sampleRate", "bitsPerSample", "floatingPoint", "channels",
+                    "channelLayout", "frames", "durationSeconds", "bitRate"):
+            self.assertEqual(record.get(key), info.get(key), key)
+        problems = [(problem["kind"], problem["text"]) for problem in check["findings"]]
+        self.assertEqual([(problem["kind"], problem["text"]) for problem in record.get("problems", [])], problems)
+        self.assertEqual(record["state"], "whole" if info["isWhole"] and not problems else "damaged")
+        if "sha256" in info:
+            self.assertEqual(record["soundHash"], info["sha256"])
+        tags.pop("path")
+        if "error" in tags or "sources" not in tags:
+            self.assertEqual(record.get("tags"), tags if "chunks" in tags else None)
+        else:
+            self.assertEqual(record["tags"], tags)
+            for key in ("tempo", "beatCount", "signature", "title", "genre"):
+                self.assertEqual(record.get(key), tags.get(key, record.get(key)), key)
+            for key, tag in (("category", "instrumentType"), ("subCategory", "instrumentSubType")):
+                self.assertEqual(record.get(key), tags.get(tag), key)
+        fields = [(field["field"], field["value"], field.get("words")) for field in meta["fields"]]
+        self.assertEqual([(field["name"], field["value"], field.get("words")) for field in record.get("fields", [])], fields)
+        if "points" in overview:
+            points = base64.b64decode(record["overview"]["points"])
+            self.assertEqual(record["overview"]["framesPerPoint"], overview["framesPerPoint"])
+            self.assertEqual([list(point) for point in struct.iter_unpack("bb", points)], overview["points"])
+
+    def test_keys_and_tempos_are_understood_as_people_write_them(self):
+        cases = {"F#m": (6, "minor", "F# minor"), "Gb major": (6, "major", "F# major"), "Bbmin": (10, "minor", None), "8A": (9, "minor", "A minor"),
+                 "8B": (0, "major", "C major"), "1A": (8, "minor", None), "12B": (4, "major", None), "5b": (3, "major", None),
+                 "1d": (0, "major", None), "1m": (9, "minor", None), "12m": (2, "minor", None), "C": (0, "major", None), "Cb": (11, "major", None),
+                 "B#": (0, "major", None), "a": (9, None, "A"), "D M": (2, "major", None), "Ebmaj": (3, "major", None), "c sharp minor": (1, "minor", None),
+                 "A-flat major": (8, "major", None), "8A - Am": (9, "minor", None), "F#m/Gbm": (6, "minor", None), "(Dm)": (2, "minor", None),
+                 "": None, "13A": None, "0B": None, "H": None, "o": None, "Drums": None, "Em7b5": None, "120": None}
+        for number, key in enumerate(cases):
+            self.write(f"lib/{number}.wav", wave(chunk(b"id3 ", id3(TBPM=f"{80 + number}.5", TKEY=key))))
+        tempos = {"x1": "0", "x2": "-3", "x3": "fast", "x4": "1e9", "x5": "nan", "x6": "12x"}
+        for name, tempo in tempos.items():
+            self.write(f"lib/{name}.wav", wave(chunk(b"id3 ", id3(TBPM=tempo))))
+        records = self.records("--no-overview")
+        for number, (key, expected) in enumerate(cases.items()):
+            record = records[f"{number}.wav"]
+            with self.subTest(key=key):
+                self.assertEqual((record["tempo"], record["tempoSource"]), (80.5 + number, "id3.TBPM"))
+                found = (record.get("keyNote"), record.get("mode"))
+                self.assertEqual(found, expected[:2] if expected else (None, None))
+                self.assertEqual(record.get("keySource"), "id3.TKEY" if expected else None)
+                if expected and expected[2]:
+                    self.assertEqual(record["key"], expected[2])
+        for name in tempos:
+            self.assertNotIn("tempo", records[name + ".wav"], name)
+
+    def test_what_loops_say_of_themselves_counts_before_other_fields(self):
+        tag = chunk(b"id3 ", id3(TBPM="70", TKEY="Am", TIT2="of the tag", TALB="Album", TPE1="Somebody", TYER="1999"))
+        self.write("lib/loop.wav", wave(acid(flags=2, root=60, beats=8, tempo=120), tag, frames=192000))
+        self.write("lib/shot.wav", wave(acid(flags=1), tag))
+        self.write("lib/take.wav", wave(bext(b"Scene 1", b"Recorder", b"2026-11-23"), info(INAM=b"of the list", ICMT=b"\xc4 comment")))
+        shutil.copy(MEDIA / "bassline.aiff", self.folder / "lib")
+        records = self.records("--no-overview")
+        expected = {
+            "loop.wav": dict(kind="loop", tempo=120, tempoSource="acid", keyNote=0, key="C", keySource="acid", title="of the tag", artist="Somebody",
+                             album="Album", recorded="1999", beatCount=8),
+            "shot.wav": dict(kind="one-shot", tempo=70, tempoSource="id3.TBPM", keyNote=9, key="A minor", mode="minor", keySource="id3.TKEY"),
+            "take.wav": dict(kind="recording", title="of the list", artist="Recorder", comment="\xc4 comment", recorded="2026-11-23"),
+            "bassline.aiff": dict(kind="loop", tempo=120, tempoSource="basc", keyNote=6, mode="minor", key="F# minor", keySource="basc",
+                                  signature="4/4", category="Bass", descriptors="Dry, Grooving, Single")}
+        for name, values in expected.items():
+            self.assertEqual({key: records[name].get(key) for key in values}, values, name)
+
+    def test_texts_and_lists_of_any_size_make_small_records(self):
+        long = ("\u00fc" * 500_000).encode()
+        self.write("lib/comment.wav", wave(info(ICMT=long, INAM=b"line 1\r\nline 2\0\0")))
+        self.write("lib/unheld.wav", wave(info(ICMT=long * 10, INAM=b"title"), acid(tempo=80)))
+        self.write("lib/fields.wav", wave(info(**{f"I{number:03}": b"value" for number in range(1000)}), *[info(ICMT=b"x" * 3000)] * 1000))
+        cues = chunk(b"cue ", struct.pack("<I", 80_000) + b"".join(struct.pack("<II4sIII", n, n, b"data", 0, 0, n) for n in range(80_000)))
+        self.write("lib/cues.wav", wave(cues))
+        records = self.records()
+        for name, record in records.items():
+            self.assertLess(len(json.dumps(record)), 1_500_000, name)
+        comment = records["comment.wav"]
+        self.assertEqual((comment["comment"], comment["title"]), ("\u00fc" * 2048, "line 1  line 2"))
+        value = next(field for field in comment["fields"] if field["name"] == "info.ICMT")
+        self.assertEqual((value["value"], value["size"]), ("\u00fc" * 2048, len(long)))
+        told = records["fields.wav"]["fields"]
+        self.assertEqual(len(told) - 1 + told[-1]["value"], len(self.record("meta", "lib/fields.wav")["fields"]))
+
+    def test_waveforms_of_long_sound_are_folded(self):
+        for frames, per_point in ((1, 256), (5625 * 256, 256), (5625 * 256 + 1, 512), (5_000_000, 1024)):
+            self.write("lib/long.wav", long_wave(frames, 37))
+            waveform = self.records()["long.wav"]["overview"]
+            points = list(struct.iter_unpack("bb", base64.b64decode(waveform["points"])))
+            self.assertEqual(waveform["framesPerPoint"], per_point)
+            base = self.record("overview", "lib/long.wav")["points"]
+            times = per_point // 256
+            parts = [base[i:i + times] for i in range(0, len(base), times)]
+            self.assertEqual(points, [(min(low for low, _ in part), max(high for _, high in part)) for part in parts])
+
+    def test_a_hole_of_a_terabyte_is_silence_at_no_cost(self):
+        size = 1 << 40
+        sizes = struct.pack("<IQQQI", 28, size + 72, size, size // 4, 0)
+        with open(self.folder / "lib/hole.wav", "wb") as file:
+            file.write(b"RF64\xff\xff\xff\xffWAVEds64" + sizes + chunk(b"fmt ", struct.pack("<HHIIHH", 1, 2, 48000, 192000, 4, 16)) +
+                       b"data\xff\xff\xff\xff" + struct.pack("<hh", 32767, -32768) * 256)
+            start = file.tell() - 1024
+            file.truncate(start + size)
+        record = self.records()["hole.wav"]
+        self.assertEqual((record["frames"], record["state"], record["overview"]["framesPerPoint"]), (size // 4, "whole", 256 << 18))
+        points = base64.b64decode(record["overview"]["points"])
+        self.assertEqual((points[:2], set(points[2:])), (b"\x81\x7f", {0}))
+
+    @unittest.skipUnless(shutil.which("ffmpeg"), "no ffmpeg")
+    def test_the_same_sound_with_other_tags_has_the_same_hash(self):
+        self.make("sox -n -r 44100 -b 16 -c 2 s.wav synth 44111s sine 300 sine 400")
+        self.make("sox s.wav t.wav gain -3", "oggenc -Q s.wav -o a.ogg", "oggenc -Q -t Something_long -c KEY=Am s.wav -o b.ogg", "oggenc -Q t.wav -o c.ogg")
+        # ffmpeg rounds the edit list of MP4 anew.
+        self.make("ffmpeg -i s.wav a.m4a", "ffmpeg -i t.wav c.m4a", "cp a.m4a b.m4a", "exiftool -q -overwrite_original -Title=Something_long b.m4a")
+        for kind in ("mp3", "flac", "wma", "caf", "aiff"):
+            self.make(f"ffmpeg -i s.wav a.{kind}")
+            tags = "-metadata title=Something_long -metadata comment=Else -metadata genre=Rock"
+            self.make(f"ffmpeg -i a.{kind} -c copy {tags} b.{kind}", f"ffmpeg -i t.wav c.{kind}")
+        self.write("lib/b.wav", (self.folder / "lib/s.wav").read_bytes() + info(INAM=b"tagged"))
+        records = self.records("--hash", "--no-overview")
+        for kind in ("mp3", "flac", "ogg", "m4a", "wma", "caf", "aiff"):
+            hashes = [records[f"{name}.{kind}"]["soundHash"] for name in "abc"]
+            self.assertEqual(hashes[0], hashes[1], kind)
+            self.assertNotEqual(hashes[0], hashes[2], kind)
+        self.assertEqual(records["s.wav"]["soundHash"], records["b.wav"]["soundHash"])
+
+    def test_files_that_are_no_sound(self):
+        tone = (MEDIA / "tone-16.aiff").read_bytes()
+        files = {"empty.wav": b"", "text.aiff": b"no sound", "head.wav": wave()[:20], "notes.txt": b"no sound", "empty": b"", "picture.png": b"\x89PNG\r\n\x1a\n",
+                 "named like nothing": tone, "zeros.flac": bytes(5000), "junk.mp3": b"\1\2\3" * 999}
+        for name, content in files.items():
+            self.write("lib/" + name, content)
+        with open(self.folder / "lib/sparse.wav", "wb") as file:
+            file.truncate(1 << 40)
+        os.mkfifo(self.folder / "lib/fifo.wav")
+        (self.folder / "lib/folder.wav").mkdir()
+        records = self.records(status=None)
+        unreadable = {"empty.wav", "text.aiff", "head.wav", "zeros.flac", "junk.mp3", "sparse.wav"}
+        self.assertEqual({name for name, record in records.items() if record.get("state") == "unreadable"}, unreadable)
+        self.assertEqual(records["named like nothing"]["state"], "whole")
+        self.assertFalse({"notes.txt", "empty", "picture.png", "folder.wav"} & set(records))
+        for name in unreadable:
+            problem, = records[name]["problems"]
+            self.assertEqual({"kind": "unreadable", "text": self.record("info", "lib/" + name, status=1)["error"]}, problem, name)
+
+    def test_a_file_that_changes_while_it_is_read_is_read_again_next_time(self):
+        path = self.write("lib/busy.wav", long_wave(30_000_000, 37))
+        stop = threading.Event()
+
+        def change():
+            while not stop.wait(0.001):
+                os.utime(path)
+
+        changing = threading.Thread(target=change)
+        changing.start()
+        try:
+            record = self.records("--hash")["busy.wav"]
+        finally:
+            stop.set()
+            changing.join()
+        self.assertEqual((record["inode"], record["changed"]), (0, 0))
+        settled = self.records("--no-overview")["busy.wav"]
+        self.assertEqual(settled["inode"], path.stat().st_ino)
+
+    def test_a_file_that_shrinks_while_it_is_read_ends_well(self):
+        content = long_wave(20_000_000, 37)
+        path = self.write("lib/shrinks.wav", content)
+        stop = threading.Event()
+
+        def change():
+            while not stop.wait(0.002):
+                os.truncate(path, 1000)
+                with open(path, "r+b") as file:
+                    file.seek(0, os.SEEK_END)
+                    file.write(content[1000:len(content) // 2])
+
+        changing = threading.Thread(target=change)
+        changing.start()
+        try:
+            for _ in range(5):
+                record = self.records("--hash")["shrinks.wav"]
+                self.assertIn(record["state"], ("damaged", "unreadable"))
+                if record["inode"] != 0:
+                    self.assertLessEqual(record["frames"] * 2, record["size"])
+        finally:
+            stop.set()
+            changing.join()
+
+    def test_a_file_that_another_program_holds_is_not_waited_for_long(self):
+        shutil.copy(MEDIA / "tone-16.aiff", self.folder / "lib")
+        with subprocess.Popen([KTFILES, "lock", "--write", "lib/tone-16.aiff", "--", "sh", "-c", "echo held; cat"], cwd=self.folder,
+                              stdin=subprocess.PIPE, stdout=subprocess.PIPE) as holder:
+            self.assertEqual(holder.stdout.readline(), b"held\n")
+            record = self.records(status=None)["tone-16.aiff"]
+            holder.stdin.close()
+        self.assertEqual((record["state"], record["inode"], [problem["kind"] for problem in record["problems"]]), ("unreadable", 0, ["inUse"]))
+        self.assertEqual(self.records()["tone-16.aiff"]["state"], "whole")
+
+
+if __name__ == "__main__":
+    unittest.main()

@@ -6,7 +6,7 @@ namespace {
 
 constexpr std::int64_t kNotes = 12;
 
-void addOnce(std::vector<KeyChoice>& keys, KeyChoice key)
+void addKeyOnce(std::vector<KeyChoice>& keys, KeyChoice key)
 {
     if (std::ranges::find(keys, key) == keys.end())
         keys.push_back(std::move(key));
@@ -30,18 +30,18 @@ std::vector<KeyChoice> wantedKeys(const LibraryQuery& query)
     constexpr std::int64_t minorThird = 3;
     std::vector<KeyChoice> keys;
     for (const KeyChoice& key : query.keys)
-        addOnce(keys, key);
+        addKeyOnce(keys, key);
     if (!query.takesRelated)
         return keys;
     for (const KeyChoice& key : query.keys) {
         if (!key.note)
             continue;
         if (!key.mode.empty())
-            addOnce(keys, {key.note, key.mode == "minor" ? "major" : "minor"});
+            addKeyOnce(keys, {key.note, key.mode == "minor" ? "major" : "minor"});
         if (key.mode != "major")
-            addOnce(keys, {(*key.note + minorThird) % kNotes, "major"});
+            addKeyOnce(keys, {(*key.note + minorThird) % kNotes, "major"});
         if (key.mode != "minor")
-            addOnce(keys, {(*key.note + kNotes - minorThird) % kNotes, "minor"});
+            addKeyOnce(keys, {(*key.note + kNotes - minorThird) % kNotes, "minor"});
     }
     return keys;
 }

@@ -57,9 +57,9 @@ struct LibraryQuery {
 
     std::optional<Order> order; // else the order of relevance for terms, or of duplicates, or of paths
     bool isReversed = false;
-    std::int64_t limit = 0; // 0: none
+    std::optional<std::int64_t> limit; // 0: none
 
-    std::vector<std::string> words; // of the command line, until `settleWords` tells scopes from terms
+    std::vector<std::string> words; // those of the command line, until `settleWords` tells scopes from terms
 
     Order settledOrder() const { return order.value_or(terms.empty() ? Order::path : Order::relevance); }
 };

@@ -81,12 +81,12 @@ Argument addChoice(Verb& verb, const std::string& name, const std::string& label
         .label(label);
 }
 
-void append(std::vector<std::string>& values, const std::vector<std::string>& further)
+void appendAll(std::vector<std::string>& values, const std::vector<std::string>& further)
 {
     values.insert(values.end(), further.begin(), further.end());
 }
 
-std::span<const Choice> formats()
+std::span<const Choice> formatChoices()
 {
     static const std::vector<Choice> choices = {{"wav", {"WAVE", "RF64", "BW64"}},
                                                 {"wave", {"WAVE", "RF64", "BW64"}},
@@ -107,7 +107,6 @@ std::span<const Choice> formats()
                                                 {"mp4", {"MP4", "M4A"}},
                                                 {"flac", {"FLAC"}},
                                                 {"ogg", {"Ogg"}},
-                                                {"opus", {"Ogg"}},
                                                 {"wma", {"WMA"}},
                                                 {"wavpack", {"WavPack"}},
                                                 {"wv", {"WavPack"}},
@@ -129,7 +128,7 @@ std::span<const Choice> formats()
     return choices;
 }
 
-std::span<const Choice> kinds()
+std::span<const Choice> kindChoices()
 {
     static const std::vector<Choice> choices = {{"loop", {"loop"}},           {"loops", {"loop"}},
                                                 {"one-shot", {"one-shot"}},   {"one-shots", {"one-shot"}},
@@ -139,7 +138,7 @@ std::span<const Choice> kinds()
 }
 
 // The kinds of `info --check`, and words for several of them.
-std::span<const Choice> problems()
+std::span<const Choice> problemChoices()
 {
     static const std::vector<Choice> choices = [] {
         std::vector<Choice> all = {{"any", {}}, {"truncated", {"soundIsCut", "containerIsCut", "chunkIsCut"}}};
@@ -149,7 +148,8 @@ std::span<const Choice> problems()
               "countIsOpen",      "noChunk",           "padIsMissing",   "padIsNotZero",    "repeated",
               "formatIsLate",     "formatIsMissing",   "formatIsWrong",  "soundIsMissing",  "soundIsUneven",
               "framesDiffer",     "sizes64AreMissing", "sizes64Differ",  "byteRateDiffers", "factIsMissing",
-              "versionIsMissing", "offsetIsWrong",     "tableIsShort",   "digestIsWrong",   "digestDiffers"})
+              "versionIsMissing", "offsetIsWrong",     "tableIsShort",   "digestIsWrong",   "digestDiffers",
+              "documentIsBroken", "tracksDiffer"})
             all.push_back({kind, {std::string(kind)}});
         return all;
     }();
@@ -158,7 +158,7 @@ std::span<const Choice> problems()
 
 using Order = LibraryQuery::Order;
 
-std::span<const std::pair<std::string_view, Order>> orders()
+std::span<const std::pair<std::string_view, Order>> orderWords()
 {
     static constexpr std::pair<std::string_view, Order> kOrders[] = {
         {"name", Order::name},         {"path", Order::path},
@@ -171,9 +171,9 @@ std::span<const std::pair<std::string_view, Order>> orders()
 
 std::optional<Order> orderFromText(const std::string& text)
 {
-    const auto found =
-        std::ranges::find_if(orders(), [&](const auto& order) { return equalIgnoringASCIICase(order.first, text); });
-    return found != orders().end() ? std::optional(found->second) : std::nullopt;
+    const auto found = std::ranges::find_if(
+        orderWords(), [&](const auto& order) { return equalIgnoringASCIICase(order.first, text); });
+    return found != orderWords().end() ? std::optional(found->second) : std::nullopt;
 }
 
 std::string problemOfOrder(const std::string& text)
@@ -181,12 +181,12 @@ std::string problemOfOrder(const std::string& text)
     if (orderFromText(text))
         return {};
     std::vector<std::string_view> words;
-    for (const auto& order : orders())
+    for (const auto& order : orderWords())
         words.push_back(order.first);
     return fmt::format("{} is no order{}: {}", shownValue(text), didYouMean(text, words), fmt::join(words, ", "));
 }
 
-void addMusic(Verb& verb, LibraryQuery& query)
+void addMusicOptions(Verb& verb, LibraryQuery& query)
 {
     addValue(
         verb, "--tempo", "BPM", tempoFromText, [&](NumberRange range) { query.tempos.push_back(range); },
@@ -197,7 +197,7 @@ void addMusic(Verb& verb, LibraryQuery& query)
         "In that key: \"F# minor\", Gbm, F#, minor", "key: \"F# minor\", Gbm, Bb, or major is one");
     verb.addFlag("--related", query.takesRelated, "Relative and parallel keys too, and tempos half and twice as fast");
     addChoice(
-        verb, "--kind", "KIND", kinds(), [&](const Choice& choice) { query.kind = choice.meant.front(); },
+        verb, "--kind", "KIND", kindChoices(), [&](const Choice& choice) { query.kind = choice.meant.front(); },
         "loop, one-shot or recording", "kind", ": loop, one-shot or recording is one");
     verb.addText("--category", query.category, "Of that instrument category or sub-category").label("NAME");
     verb.addText("--genre", query.genre, "Of that genre").label("NAME");
@@ -206,7 +206,7 @@ void addMusic(Verb& verb, LibraryQuery& query)
     verb.addText("--album", query.album, "Of that album").label("NAME");
 }
 
-void addSound(Verb& verb, LibraryQuery& query)
+void addSoundOptions(Verb& verb, LibraryQuery& query)
 {
     const auto seconds = [&query]() -> NumberRange& {
         return query.seconds ? *query.seconds : query.seconds.emplace();
@@ -227,20 +227,21 @@ void addSound(Verb& verb, LibraryQuery& query)
         [&](NumberRange range) { query.channels = range; }, "Of so many channels, or in a range: 2, 3..",
         "number of channels: 2, or 3.. is one");
     addChoice(
-        verb, "--format", "FORMAT", formats(), [&](const Choice& choice) { append(query.containers, choice.meant); },
+        verb, "--format", "FORMAT", formatChoices(),
+        [&](const Choice& choice) { appendAll(query.containers, choice.meant); },
         "wav, aiff, caf, mp3, m4a, flac, ogg, and others", "format",
         ": wav, aiff, aifc, caf, mp3, aac, m4a, flac, ogg, wma, wavpack, w64 are some");
     addChoice(
-        verb, "--problem", "KIND", problems(),
+        verb, "--problem", "KIND", problemChoices(),
         [&](const Choice& choice) {
             query.takesAnyProblem = query.takesAnyProblem || choice.meant.empty();
-            append(query.problems, choice.meant);
+            appendAll(query.problems, choice.meant);
         },
         "With that problem: truncated, unreadable, a kind that info --check names, or any", "problem",
         ": any, truncated, unreadable, or a kind that info --check names, such as soundIsCut");
 }
 
-void addOrder(Verb& verb, LibraryQuery& query)
+void addOrderOptions(Verb& verb, LibraryQuery& query)
 {
     verb.addFlag("--duplicates", query.takesDuplicates,
                  "Files with the sound of another one, together; of indexes made with --hash");
@@ -253,8 +254,7 @@ void addOrder(Verb& verb, LibraryQuery& query)
             "Order by name, path, tempo, key, duration, size, modified, category, rate or relevance", problemOfOrder)
         .label("WHAT");
     verb.addFlag("--reverse", query.isReversed, "The other way round");
-    verb.addNumber(
-        "--limit", [&](long number) { query.limit = number; }, {0, 1'000'000'000}, "At most N files; 0 for all");
+    verb.addNumber("--limit", query.limit, {0, 1'000'000'000}, "At most N files; 0 for all");
 }
 
 bool namesFolder(const std::string& word)
@@ -264,7 +264,7 @@ bool namesFolder(const std::string& word)
 }
 
 // A folder that is gone is taken for where its name says, since the index may know it.
-LibraryQuery::Scope scopeOf(const std::string& word)
+LibraryQuery::Scope scopeNamed(const std::string& word)
 {
     namespace fs = std::filesystem;
     std::error_code error;
@@ -280,9 +280,9 @@ LibraryQuery::Scope scopeOf(const std::string& word)
 void addQueryOptions(Verb& verb, LibraryQuery& query)
 {
     verb.addTexts("WORD", query.words, "A folder to look in, and what the names, folders and texts of files have");
-    addMusic(verb, query);
-    addSound(verb, query);
-    addOrder(verb, query);
+    addMusicOptions(verb, query);
+    addSoundOptions(verb, query);
+    addOrderOptions(verb, query);
 }
 
 void settleWords(LibraryQuery& query)
@@ -291,7 +291,7 @@ void settleWords(LibraryQuery& query)
         const bool hasSlash = word.find('/') != word.npos || word == "." || word == "..";
         const bool isFirst = query.scopes.empty() && query.terms.empty();
         if (word.ends_with('/') || ((hasSlash || isFirst) && namesFolder(word)))
-            query.scopes.push_back(scopeOf(word));
+            query.scopes.push_back(scopeNamed(word));
         else
             query.terms.push_back(word);
     }

@@ -176,7 +176,7 @@ public:
     Answer(Library& library, const LibraryQuery& query, LibraryParts parts)
         : conditions_(query),
           parts_(parts),
-          limit_(query.limit),
+          limit_(query.limit.value_or(0)),
           files_(
               library.database(),
               fmt::format("SELECT f.id, d.path, f.name, f.size, f.modified, f.indexed, {} FROM files f JOIN folders d "

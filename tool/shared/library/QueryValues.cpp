@@ -1,6 +1,7 @@
 #include "tool/shared/library/QueryValues.h"
 
 #include "platform/core/ASCIICase.h"
+#include "tool/shared/indexing/KeyText.h"
 #include "tool/shared/output/ClockTime.h"
 
 #include <algorithm>
@@ -12,13 +13,13 @@
 
 namespace {
 
-std::string_view withoutSpace(std::string_view text)
+std::string_view withoutPadding(std::string_view text)
 {
     const std::size_t start = std::min(text.find_first_not_of(" \t"), text.size());
     return text.substr(start, text.find_last_not_of(" \t") + 1 - start);
 }
 
-std::string lower(std::string_view text)
+std::string inSmallLetters(std::string_view text)
 {
     std::string result(text);
     std::ranges::transform(result, result.begin(), asciiLower);
@@ -33,11 +34,11 @@ struct Unit {
 // The longest name that ends the text counts.
 std::optional<double> numberWithUnit(std::string_view text, std::span<const Unit> units)
 {
-    const std::string lowered = lower(withoutSpace(text));
+    const std::string lowered = inSmallLetters(withoutPadding(text));
     for (const Unit& unit : units)
         if (lowered.ends_with(unit.name))
             if (const auto number = plainNumberFromText(
-                    withoutSpace(std::string_view(lowered).substr(0, lowered.size() - unit.name.size()))))
+                    withoutPadding(std::string_view(lowered).substr(0, lowered.size() - unit.name.size()))))
                 return *number * unit.factor;
     return std::nullopt;
 }
@@ -116,32 +117,6 @@ std::optional<std::int64_t> daysAgo(int days)
     return static_cast<std::int64_t>(std::mktime(&midnight)) * 1'000'000'000;
 }
 
-// Removes a sign of raised or lowered notes; its semitones.
-int takeAccidental(std::string_view& text)
-{
-    constexpr std::pair<std::string_view, int> kSigns[] = {{"♯", 1},      {"♭", -1},     {"#", 1},      {"b", -1},
-                                                           {" sharp", 1}, {" flat", -1}, {"-sharp", 1}, {"-flat", -1},
-                                                           {"sharp", 1},  {"flat", -1}};
-    for (const auto& [sign, semitones] : kSigns)
-        if (text.starts_with(sign)) {
-            text.remove_prefix(sign.size());
-            return semitones;
-        }
-    return 0;
-}
-
-// Of a word behind a note, or alone; none for another word.
-std::optional<std::string> modeFromText(std::string_view text)
-{
-    constexpr std::pair<std::string_view, std::string_view> kModes[] = {
-        {"", ""}, {"m", "minor"}, {"min", "minor"}, {"minor", "minor"}, {"maj", "major"}, {"major", "major"}};
-    if (text == "M")
-        return "major";
-    const std::string word = lower(text);
-    const auto* const found = std::ranges::find(kModes, word, [](const auto& each) { return each.first; });
-    return found != std::end(kModes) ? std::optional(std::string(found->second)) : std::nullopt;
-}
-
 } // namespace
 
 std::optional<double> plainNumberFromText(std::string_view text)
@@ -155,7 +130,7 @@ std::optional<double> plainNumberFromText(std::string_view text)
 std::optional<double> secondsFromText(std::string_view text)
 {
     constexpr Unit kUnits[] = {{"ms", 0.001}, {"min", 60}, {"sec", 1}, {"s", 1}, {"m", 60}, {"h", 3600}};
-    const std::string plain(withoutSpace(text));
+    const std::string plain(withoutPadding(text));
     if (const auto seconds = timeFromText(plain))
         return seconds;
     return numberWithUnit(plain, kUnits);
@@ -171,14 +146,14 @@ std::optional<double> rateFromText(std::string_view text)
 
 std::optional<NumberRange> rangeFromText(std::string_view text, const NumberReader& read)
 {
-    text = withoutSpace(text);
+    text = withoutPadding(text);
     const std::size_t dots = text.find("..");
     if (dots == text.npos) {
         const auto number = read(text);
         return number ? std::optional(NumberRange{*number, *number}) : std::nullopt;
     }
     NumberRange range;
-    const std::string_view first = withoutSpace(text.substr(0, dots)), last = withoutSpace(text.substr(dots + 2));
+    const std::string_view first = withoutPadding(text.substr(0, dots)), last = withoutPadding(text.substr(dots + 2));
     if (!first.empty()) {
         const auto least = read(first);
         if (!least)
@@ -208,22 +183,16 @@ std::optional<NumberRange> tempoFromText(std::string_view text)
 
 std::optional<KeyChoice> keyFromText(std::string_view text)
 {
-    constexpr std::string_view kLetters = "c d ef g a b"; // at their semitones
-    constexpr int kNotes = 12;
-    text = withoutSpace(text);
-    if (text.empty())
+    const std::string word = inSmallLetters(withoutPadding(text));
+    for (const auto* const mode : {"major", "minor"})
+        if (word == mode || word == std::string_view(mode).substr(0, 3))
+            return KeyChoice{std::nullopt, mode};
+    std::string name(withoutPadding(text));
+    if (name.empty())
         return std::nullopt;
-    if (const auto mode = modeFromText(text); mode && text.size() > 1) // "m" alone says too little
-        return KeyChoice{std::nullopt, *mode};
-    const std::size_t semitones = text.front() == ' ' ? kLetters.npos : kLetters.find(asciiLower(text.front()));
-    if (semitones == kLetters.npos)
-        return std::nullopt;
-    text.remove_prefix(1);
-    const int note = (static_cast<int>(semitones) + takeAccidental(text) + kNotes) % kNotes;
-    if (text.starts_with('-') || text.starts_with('_'))
-        text.remove_prefix(1);
-    const auto mode = modeFromText(withoutSpace(text));
-    return mode ? std::optional(KeyChoice{note, *mode}) : std::nullopt;
+    name.front() = asciiLower(name.front()); // a note alone leaves the mode open, large or small
+    const auto key = keyOfText(name);
+    return key ? std::optional(KeyChoice{key->note, key->mode}) : std::nullopt;
 }
 
 std::optional<std::int64_t> sinceFromText(std::string_view text)
@@ -233,7 +202,7 @@ std::optional<std::int64_t> sinceFromText(std::string_view text)
                               {"d", kDay},           {"weeks", 7 * kDay},  {"week", 7 * kDay},    {"w", 7 * kDay},
                               {"months", 30 * kDay}, {"month", 30 * kDay}, {"years", 365 * kDay}, {"year", 365 * kDay},
                               {"y", 365 * kDay}};
-    text = withoutSpace(text);
+    text = withoutPadding(text);
     if (equalIgnoringASCIICase(text, "today"))
         return daysAgo(0);
     if (equalIgnoringASCIICase(text, "yesterday"))

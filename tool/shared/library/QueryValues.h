@@ -19,7 +19,7 @@ std::optional<double> rateFromText(std::string_view text);
 std::optional<NumberRange> rangeFromText(std::string_view text, const NumberReader& read);
 /// A range of tempos; one tempo stands for all that are rounded to it: 120 for 119.5 to 120.5.
 std::optional<NumberRange> tempoFromText(std::string_view text);
-/// "F# minor", "Gb min", "f#m", "F♯", "minor".
+/// "F# minor", "Gb min", "f#m", "F♯", "minor"; "8A" and "1m" too.
 std::optional<KeyChoice> keyFromText(std::string_view text);
 /// "today", "yesterday", "90min", "12h", "3d", "2w", "6 months", "1y", "2026-11-01", "2026-11-01T12:30", the latter two
 /// in local time unless a "Z" follows: in nanoseconds since 1970.

@@ -33,6 +33,9 @@ _ktfiles()
         overview/--format) COMPREPLY=($(compgen -W 'audiowaveform' -- "$cur")); return ;;
         overview/--gain) COMPREPLY=($(compgen -W 'auto 6 12 24' -- "$cur")); return ;;
         overview/--channels) COMPREPLY=($(compgen -W 'split sum 1 2' -- "$cur")); return ;;
+        find/--format | page/--format) COMPREPLY=($(compgen -W 'wav aiff aifc caf mp3 aac m4a flac ogg wma wavpack w64' -- "$cur")); return ;;
+        find/--rate | page/--rate) COMPREPLY=($(compgen -W '44.1k 48k 88.2k 96k' -- "$cur")); return ;;
+        find/--channels | page/--channels) COMPREPLY=($(compgen -W '1 2 3..' -- "$cur")); return ;;
         decode/--channels | */--frames | */--frames-per-point) return ;;
     esac
     case $prev in
@@ -40,16 +43,22 @@ _ktfiles()
         --coordination | --with) _filedir -d; return ;;
         --files-from | --from | -o | --output | --png | --svg | --sheet) _filedir; return ;;
         --only) COMPREPLY=($(compgen -W 'bext ixml info cue smpl inst acid cart chna axml comt mark strg regn id3 xmp' -- "$cur")); return ;;
+        --kind) COMPREPLY=($(compgen -W 'loop one-shot recording' -- "$cur")); return ;;
+        --problem) COMPREPLY=($(compgen -W 'any truncated unreadable' -- "$cur")); return ;;
+        --since) COMPREPLY=($(compgen -W 'today yesterday 3d 2w' -- "$cur")); return ;;
+        --sort) COMPREPLY=($(compgen -W 'name path tempo key duration size modified category rate relevance' -- "$cur")); return ;;
+        --db) _filedir db; return ;;
+        --tempo | --key | --category | --genre | --artist | --title | --album | --longer | --shorter | --limit) return ;;
         --sidecar) return ;;
         --colors) COMPREPLY=($(compgen -W 'night day amber rose ink' -- "$cur")); return ;;
         --width | --height | --start | --end | --alternative | --keep | --timeout) return ;;
     esac
 
     if ((cword == 1)); then
-        COMPREPLY=($(compgen -W 'info pair chunks tags meta scan page overview adm project lock locks decode help --help --version -V' -- "$cur"))
+        COMPREPLY=($(compgen -W 'info pair chunks tags meta scan find page overview adm project lock locks decode help --help --version -V' -- "$cur"))
     elif [[ $verb == help ]]; then
         if ((cword == 2)); then
-            COMPREPLY=($(compgen -W 'info pair chunks tags meta scan page overview adm project lock locks decode' -- "$cur"))
+            COMPREPLY=($(compgen -W 'info pair chunks tags meta scan find page overview adm project lock locks decode' -- "$cur"))
         elif ((cword == 3)) && [[ $object == chunks ]]; then
             COMPREPLY=($(compgen -W 'get add remove' -- "$cur"))
         elif ((cword == 3)) && [[ $object == tags ]]; then
@@ -73,6 +82,8 @@ _ktfiles()
                 --force --threads $files $common" -- "$cur")) ;;
             lock/*) COMPREPLY=($(compgen -W "--read --write --presenter --timeout -- $common" -- "$cur")) ;;
             scan/*) COMPREPLY=($(compgen -W "--csv --threads $files $common" -- "$cur")) ;;
+            find/*) COMPREPLY=($(compgen -W "--tempo --key --related --kind --category --genre --artist --title --album --longer --shorter
+                --rate --channels --format --problem --duplicates --since --sort --reverse --limit --db --fresh --null --csv $common" -- "$cur")) ;;
             page/*) COMPREPLY=($(compgen -W "--tempo --key --related --kind --category --genre --artist --title --album --longer --shorter
                 --rate --channels --format --problem --duplicates --since --sort --reverse --limit
                 --output --heading --previews --embed-previews --force --db $common" -- "$cur")) ;;

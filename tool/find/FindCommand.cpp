@@ -1,7 +1,9 @@
 // ktfiles find: lists the files of an index that are as is asked.
 #include "tool/find/FindReport.h"
 #include "tool/shared/arguments/CommandLine.h"
+#include "tool/shared/indexing/LibraryUpdate.h"
 #include "tool/shared/library/LibraryQueryOptions.h"
+#include "tool/shared/output/FilesProgress.h"
 #include "tool/shared/output/ProgressLine.h"
 
 #include <unistd.h>
@@ -14,6 +16,7 @@ struct FindArguments {
     LibraryQuery query;
     std::string database;
     bool endsWithNul = false;
+    bool isFresh = false;
 };
 
 void tellOnTerminal(const std::string& text)
@@ -22,6 +25,20 @@ void tellOnTerminal(const std::string& text)
     const progressline::Cleared cleared;
     if (isTerminal(STDERR_FILENO) && !Output::standard().failed())
         fmt::print(stderr, "{}\n", text);
+}
+
+/// What cannot be looked at is told, and stays in the index as it was.
+void bringUpToDate(const std::string& path, const LibraryQuery& query, bool quiet)
+{
+    using Mode = SQLDatabase::Mode;
+    Library library(path, query.scopes.empty() ? Mode::write : Mode::create);
+    LibraryUpdate update;
+    for (const LibraryQuery::Scope& scope : query.scopes)
+        update.folders.push_back(scope.path);
+    FilesProgress progress("indexing", quiet);
+    update.progress = &progress;
+    update.tell = reportFailure;
+    updateLibrary(library, update);
 }
 
 /// Returns whether a file was found.
@@ -33,6 +50,8 @@ bool findFiles(const FindArguments& arguments, const std::string& path, const Ou
         query.limit = 1;
     else if (report.form() == Form::table && !query.limit)
         query.limit = kRowsOfTable;
+    if (arguments.isFresh)
+        bringUpToDate(path, query, options.quiet);
     Library library(path, SQLDatabase::Mode::read);
     LibrarySearch search(library, query, report.parts());
     std::int64_t found = 0;
@@ -66,7 +85,8 @@ void declareFind(CommandLine& commandLine)
                                      [&commandLine] { return runFind(arguments, commandLine.output()); });
     addQueryOptions(verb, arguments.query);
     CommandLine::addPath(verb, "--db", arguments.database, "Ask the index in that file, not that of the user")
-        .label("INDEX");
+        .label("FILE");
+    verb.addFlag("--fresh", arguments.isFresh, "Bring the index up to date first, with FOLDER or all that is in it");
     verb.addFlag("-0,--null", arguments.endsWithNul, "Print paths alone, each with a NUL byte behind it, for xargs -0");
     commandLine.addCsv(verb);
 }

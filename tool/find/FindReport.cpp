@@ -91,6 +91,13 @@ std::string shownTempo(const LibraryRecord& record)
     return record.tempo ? fmt::format("{:.10g}", std::round(*record.tempo * 100) / 100) : "";
 }
 
+// To the tenth of a second where that matters.
+std::string lengthOf(const LibraryRecord& record)
+{
+    constexpr double kMinute = 60;
+    return record.durationSeconds ? clockText(*record.durationSeconds, *record.durationSeconds < kMinute ? 1 : 0) : "";
+}
+
 } // namespace
 
 // Rows are written as they come, so the widths are fixed in advance; the path, which no width fits, comes last.
@@ -132,10 +139,8 @@ void FindReport::addRow(const LibraryRecord& record)
 {
     if (std::exchange(isFirst_, false))
         table_.printTitles(output_, color_);
-    const auto& seconds = record.durationSeconds;
-    table_.printRow(output_, {sparklineOf(record), shownTempo(record), printable(record.key),
-                              seconds ? clockText(*seconds, 0) : "", printable(record.category),
-                              printable(shownName(shownPath(record)))});
+    table_.printRow(output_, {sparklineOf(record), shownTempo(record), printable(record.key), lengthOf(record),
+                              printable(record.category), printable(shownName(shownPath(record)))});
 }
 
 void FindReport::addData(const LibraryRecord& record)

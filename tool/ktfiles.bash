@@ -65,6 +65,8 @@ _ktfiles()
             COMPREPLY=($(compgen -W 'set remove copy' -- "$cur"))
         elif ((cword == 3)) && [[ $object == meta ]]; then
             COMPREPLY=($(compgen -W 'set remove copy export import' -- "$cur"))
+        elif ((cword == 3)) && [[ $object == index ]]; then
+            COMPREPLY=($(compgen -W 'merge export' -- "$cur"))
         elif ((cword == 3)) && [[ $object == project ]]; then
             COMPREPLY=($(compgen -W "$projects" -- "$cur"))
         fi
@@ -87,6 +89,7 @@ _ktfiles()
             page/*) COMPREPLY=($(compgen -W "--tempo --key --related --kind --category --genre --artist --title --album --longer --shorter
                 --rate --channels --format --problem --duplicates --since --sort --reverse --limit
                 --output --heading --previews --embed-previews --force --db $common" -- "$cur")) ;;
+            index/merge | index/export) COMPREPLY=($(compgen -W "--db $common" -- "$cur")) ;;
             meta/set) COMPREPLY=($(compgen -W "--lenient --loudness --md5 $files $edit $common" -- "$cur")) ;;
             meta/remove) COMPREPLY=($(compgen -W "$files $edit $common" -- "$cur")) ;;
             meta/copy) COMPREPLY=($(compgen -W "--only --lenient $files $edit $common" -- "$cur")) ;;
@@ -130,6 +133,8 @@ _ktfiles()
             COMPREPLY+=($(compgen -W "$fields" -- "$cur"))
         elif ((cword == 2)) && [[ $verb == meta ]]; then
             COMPREPLY+=($(compgen -W 'set remove copy export import' -- "$cur"))
+        elif ((cword == 2)) && [[ $verb == index ]]; then
+            COMPREPLY+=($(compgen -W 'merge export' -- "$cur"))
         elif ((cword == 2)) && [[ $verb == tags ]]; then
             COMPREPLY+=($(compgen -W 'set remove copy' -- "$cur"))
         elif ((cword == 2)) && [[ $verb == chunks ]]; then

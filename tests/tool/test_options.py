@@ -8,7 +8,7 @@ import unittest
 from command import CommandTest
 
 ROOT = pathlib.Path(__file__).resolve().parents[2]
-OBJECTS = {"chunks": ["get", "add", "remove"], "tags": ["set", "remove", "copy"], "meta": ["set", "remove", "export", "import", "copy"],
+OBJECTS = {"chunks": ["get", "add", "remove"], "tags": ["set", "remove", "copy"], "meta": ["set", "remove", "export", "import", "copy"], "index": ["merge", "export"],
            "project": ["media", "dirs", "backup", "restore", "settle", "rename-alternative"]}
 # What is written once for several verbs, in sections of their own.
 COMMON = {"OPTIONS", "EDITS", "Folders and lists of files", "Sidecars"}

@@ -1,6 +1,7 @@
 // ktfiles index: makes the index of a library, and brings it up to date.
 #include "tool/index/EndOfWork.h"
 #include "tool/index/IndexObjects.h"
+#include "tool/index/IndexRecords.h"
 #include "tool/shared/arguments/CommandLine.h"
 #include "tool/shared/arguments/ThreadsOption.h"
 #include "tool/shared/indexing/LibraryUpdate.h"
@@ -22,6 +23,7 @@ struct IndexArguments {
     bool hashes = false;
     bool omitsOverviews = false;
     bool prunes = false;
+    bool writesRecords = false;
     unsigned threads = 0;
     LibraryShard shard;
 };
@@ -95,11 +97,25 @@ LibraryChanges updateIndex(Library& library, LibraryUpdate update, bool quiet)
     return updateLibrary(library, update);
 }
 
+bool runRecords(const IndexArguments& arguments, LibraryUpdate update, const OutputOptions& options)
+{
+    if (update.folders.empty())
+        throw MissingArgument(arguments.folders.label);
+    if (!arguments.database.empty() || arguments.prunes)
+        throw UsageError("--records needs no index: --db and --prune are for one");
+    const EndOfWork ending;
+    const bool isGood = writeIndexRecords(std::move(update), options);
+    EndOfWork::endIfAsked();
+    return isGood;
+}
+
 bool runIndex(const IndexArguments& arguments, const OutputOptions& options)
 {
     LibraryUpdate update;
     if (!reportingFailures(arguments.folders.listName(), [&] { update = updateFor(arguments); }))
         return false;
+    if (arguments.writesRecords)
+        return runRecords(arguments, std::move(update), options);
     const std::string path = arguments.database.empty() ? defaultLibrary() : arguments.database;
     if (update.folders.empty() && ::access(path.c_str(), F_OK) != 0)
         throw MissingArgument(arguments.folders.label);
@@ -135,6 +151,8 @@ void declareIndex(CommandLine& commandLine)
     };
     verb.addText("--shard", takeShard, "Of N parts of the files, only the one with number I", shardProblem)
         .label("I/N");
+    verb.addFlag("--records", arguments.writesRecords,
+                 "Write what would be in an index as JSON Lines, for others to merge");
     addThreads(verb, arguments.threads);
     declareIndexMerge(commandLine, verb);
     declareIndexExport(commandLine, verb);

@@ -161,12 +161,13 @@ public:
     void add(const std::string& source, const MergeCounts& counts)
     {
         if (options_.wantsJson()) {
-            JsonWriter& json = json_.begin().beginObject();
-            json.member("path", shownName(source)).member("added", counts.added).member("changed", counts.changed);
-            json.member("same", counts.same).member("passedOver", counts.passedOver).endObject();
+            JsonWriter& json =
+                json_.begin().beginObject().member("path", shownName(source)).key("counts").beginObject();
+            json.member("added", counts.added).member("changed", counts.changed).member("unchanged", counts.same);
+            json.member("passedOver", counts.passedOver).endObject().endObject();
             json_.end();
         } else if (!options_.quiet) {
-            Output::standard().print("merged {}: {} added, {} changed, {} the same\n", printable(shownName(source)),
+            Output::standard().print("merged {}: {} added, {} changed, {} unchanged\n", printable(shownName(source)),
                                      counts.added, counts.changed, counts.same);
         }
     }

@@ -33,6 +33,25 @@ bool isTruth(KnownWhole LibraryRecord::*member)
     return member == &LibraryRecord::floatingPoint;
 }
 
+// The same of texts with ", " between them, which are arrays.
+bool isList(KnownText LibraryRecord::*member)
+{
+    return member == &LibraryRecord::descriptors;
+}
+
+constexpr std::string_view kBetweenWords = ", ";
+
+std::vector<std::string> listOf(std::string_view text)
+{
+    std::vector<std::string> words;
+    for (std::size_t end = text.find(kBetweenWords); end != text.npos; end = text.find(kBetweenWords)) {
+        words.emplace_back(text.substr(0, end));
+        text.remove_prefix(end + kBetweenWords.size());
+    }
+    words.emplace_back(text);
+    return words;
+}
+
 // Rates are whole numbers but for a few files; 44100.0 would be another number to some readers.
 bool isWritableWhole(double value)
 {
@@ -45,7 +64,13 @@ struct MemberWriter {
     const LibraryRecord& record;
     const char* key;
 
-    void operator()(KnownText LibraryRecord::*member) const { json.knownMember(std::string(key), record.*member); }
+    void operator()(KnownText LibraryRecord::*member) const
+    {
+        if (const KnownText& text = record.*member; !text.empty() && isList(member))
+            json.member(std::string(key), listOf(text));
+        else
+            json.knownMember(std::string(key), text);
+    }
     void operator()(KnownWhole LibraryRecord::*member) const
     {
         if (const KnownWhole& number = record.*member; number && isTruth(member))
@@ -221,12 +246,29 @@ std::int64_t wholeFrom(const JsonTree& value, const char* key)
     return value.get<std::int64_t>();
 }
 
+KnownText textOfList(const JsonTree& values, const char* key)
+{
+    if (!values.is_array())
+        failForType(key);
+    KnownText text;
+    for (bool isFirst = true; const JsonTree& value : values) {
+        const std::string word = textFrom(value, key);
+        if (word.find(kBetweenWords) != word.npos)
+            throw Failure(fmt::format("{} has two words in one", key));
+        (text += std::exchange(isFirst, false) ? "" : kBetweenWords) += word;
+    }
+    return text;
+}
+
 struct MemberReader {
     LibraryRecord& record;
     const JsonTree& value;
     const char* key;
 
-    void operator()(KnownText LibraryRecord::*member) const { record.*member = textFrom(value, key); }
+    void operator()(KnownText LibraryRecord::*member) const
+    {
+        record.*member = isList(member) ? textOfList(value, key) : textFrom(value, key);
+    }
     void operator()(KnownWhole LibraryRecord::*member) const
     {
         if (!isTruth(member))
@@ -250,6 +292,19 @@ FilePlace placeFrom(const std::string& path)
     if (slash == path.npos)
         throw Failure("the path is not absolute and plain");
     return {path.substr(0, slash + 1), path.substr(slash + 1)};
+}
+
+SeenStamp stampFrom(const JsonTree& value)
+{
+    if (!value.is_object() || value.size() != std::size(kStampKeys))
+        failForType("stamp");
+    SeenStamp stamp;
+    for (const auto& [key, member] : kStampKeys) {
+        if (!value.contains(key))
+            failForType("stamp");
+        stamp.*member = wholeFrom(value[key], key);
+    }
+    return stamp;
 }
 
 std::vector<LibraryProblem> problemsFrom(const JsonTree& values)
@@ -287,8 +342,7 @@ LibraryRecord recordFrom(JsonMembers& members)
 {
     LibraryRecord record;
     record.place = placeFrom(nameOfIndexed(textFrom(members.need("path"), "path")));
-    for (const auto& [key, member] : kStampKeys)
-        record.stamp.*member = wholeFrom(members.need(key), key);
+    record.stamp = stampFrom(members.need("stamp"));
     record.indexed = wholeFrom(members.need("indexed"), "indexed");
     for (const LibraryColumn& column : libraryColumns())
         if (const JsonTree* const value = members.take(column.key))
@@ -301,10 +355,10 @@ LibraryRecord recordFrom(JsonMembers& members)
         requireFields(*value);
         record.fields = members.asWritten("fields");
     }
-    if (const JsonTree* const value = members.take("tags")) {
+    if (const JsonTree* const value = members.take("loopTags")) {
         if (!value->is_object())
-            failForType("tags");
-        record.tags = members.asWritten("tags");
+            failForType("loopTags");
+        record.tags = members.asWritten("loopTags");
     }
     requireSound(record);
     return record;
@@ -323,10 +377,10 @@ LibraryRoot rootFrom(JsonMembers& members)
 
 void writeLibraryRecord(JsonWriter& json, const LibraryRecord& record)
 {
-    json.beginObject().member("path", indexedName(record.place.path()));
+    json.beginObject().member("path", indexedName(record.place.path())).key("stamp").beginObject();
     for (const auto& [key, member] : kStampKeys)
         json.member(std::string(key), record.stamp.*member);
-    json.member("indexed", record.indexed);
+    json.endObject().member("indexed", record.indexed);
     for (const LibraryColumn& column : libraryColumns())
         std::visit(MemberWriter{json, record, column.key}, column.member);
     if (!record.problems.empty()) {
@@ -342,7 +396,7 @@ void writeLibraryRecord(JsonWriter& json, const LibraryRecord& record)
     if (!record.fields.empty())
         json.key("fields").writeJson(record.fields);
     if (!record.tags.empty())
-        json.key("tags").writeJson(record.tags);
+        json.key("loopTags").writeJson(record.tags);
     json.endObject();
 }
 

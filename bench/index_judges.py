@@ -58,10 +58,24 @@ def tags_of(number):
             "genre": words.choice(GENRES), "comment": f"made for a test, {number}", "tempo": str(words.randint(60, 180))}
 
 
+def sound_of(number):
+    """Rate, channels and seconds of what is encoded."""
+    rate = RATES[number // 16 % 4]
+    return rate, 1 + number // 7 % 2, round((0.3 + (number * 37 % 100) / 125) * rate) / rate
+
+
+def as_made(path):
+    """What was made, of a copy of the file with the number that its name ends with."""
+    number = int(path.stem.rpartition("-")[2])
+    rate, channels, seconds = sound_of(number)
+    rates = {"mp3": min(rate, 48000), "opus": 48000}
+    return common(path, duration=seconds, rate=rates.get(path.suffix[1:], rate), channels=channels,
+                  title=tags_of(number)["title"] if path.suffix != ".caf" else None)
+
+
 def make(folder, number):
     """One file, of the format that is next in turn, by the program that people make it with."""
-    rate, channels = RATES[number // 16 % 4], 1 + number // 7 % 2
-    seconds = 0.3 + (number * 37 % 100) / 125
+    rate, channels, seconds = sound_of(number)
     tags, made = tags_of(number), folder / f"source-{number}.wav"
 
     def run(*command):
@@ -72,7 +86,7 @@ def make(folder, number):
         run("ffmpeg", "-v", "error", "-y", "-i", made, *options, *words, folder / name)
         return folder / name
 
-    run("sox", "-n", "-r", rate, "-c", channels, "-b", "16", made, "synth", seconds, "pluck", 40 + number % 40, "gain", "-6")
+    run("sox", "-n", "-r", rate, "-c", channels, "-b", "16", made, "synth", f"{seconds:.9f}", "pluck", 40 + number % 40, "gain", "-6")
     path = folder / f"{number:04}"
     kind = number % 16
     comments = [f"{key.upper()}={value}" for key, value in {**tags, "bpm": tags["tempo"]}.items() if key != "tempo"]
@@ -151,7 +165,10 @@ def by_exiftool(text):
     for line in json.loads(text):
         def first(*keys, line=line):
             return next((line[key] for key in keys if key in line), None)
-        yield common(line["SourceFile"], duration=line.get("Duration"), rate=first("SampleRate", "AudioSampleRate"),
+        rate = first("SampleRate", "AudioSampleRate")
+        if line.get("FileType") == "MP3":  # a code, in what the program writes for programs
+            rate = None
+        yield common(line["SourceFile"], duration=line.get("Duration"), rate=rate,
                      channels=first("NumChannels", "Channels", "AudioChannels"), bits=first("BitsPerSample", "SampleSize", "AudioBitsPerSample"),
                      title=first("Title", "Name"), artist=first("Artist", "Author"), album=first("Album", "Product"), genre=line.get("Genre"),
                      comment=first("Comment", "Annotation", "Description"), tempo=first("BeatsPerMinute", "Bpm"))
@@ -217,8 +234,26 @@ def programs(ktfiles, folder, database):
             "mutagen": ["/usr/bin/python3", "-c", MUTAGEN, folder], "mediainfo": ["mediainfo", "--Output=JSON", folder], "exiftool": ["exiftool", "-r", "-json", folder]}
 
 
-# Who is right where a program says something else, by program, field and suffix; "*" is any. None of these is ours to change.
-JUDGED = {}
+# Who is right where a program says something else, by program, field and suffix; "*" is any suffix. The maker of the files knows what
+# was made: where the index says the same, it is right.
+LATIN = "the index: the text is UTF-8, as the program that made the file writes it, and is taken for an older encoding"
+JUDGED = {
+    **{("exiftool", field, "wav"): LATIN for field in ("title", "artist")},
+    **{("exiftool", field, "aiff"): LATIN for field in ("title", "artist")},
+    **{("mediainfo", field, suffix): LATIN for field in ("title", "artist") for suffix in ("wav", "aiff")},
+    ("exiftool", "duration", "wav"): "the index: exiftool divides the size of the file, with its other chunks, by the rate of bytes",
+    ("exiftool", "duration", "mp3"): "the index: silence that the encoder added is no sound; exiftool estimates from the rate of bits",
+    ("exiftool", "duration", "ogg"): "the index: exiftool estimates from the rate of bits",
+    ("mediainfo", "duration", "mp3"): "the index: silence that the encoder added is no sound; mediainfo counts it",
+    ("mediainfo", "duration", "caf"): "the index, which says what was made",
+    ("mediainfo", "duration", "wv"): "the index: mediainfo reads the first block only",
+    ("exiftool", "rate", "opus"): "the index: Opus is decoded at 48 kHz; the other rate is that of what was encoded, for information (RFC 7845)",
+    ("mediainfo", "rate", "opus"): "the index, as beside exiftool",
+    ("exiftool", "channels", "m4a"): "the index: the sample entry of AAC says 2 always, the configuration of the decoder says how many there are",
+    ("mutagen", "channels", "m4a"): "the index, as beside exiftool",
+    **{(program, "no bits", suffix): "a matter of words: the index has bits of linear PCM only; lossless sound has as many when it is decoded"
+       for program in ("exiftool", "mediainfo", "mutagen") for suffix in ("flac", "wv", "m4a")},
+}
 
 
 def verdict(program, field, suffix):
@@ -262,7 +297,7 @@ def compare(ktfiles, folder, paths, tell=print):
     ours = chosen(by_ktfiles(records.decode()))
     if len(ours) != len(names):
         tell(f"of {len(names)} files {len(ours)} are in the index")
-    theirs = {"exiftool": chosen(by_exiftool(output("exiftool", "-n", "-json", *names))), "mediainfo": chosen(by_mediainfo(output("mediainfo", "--Output=JSON", *names)))}
+    theirs = {"the maker": {str(path): as_made(path) for path in paths}, "exiftool": chosen(by_exiftool(output("exiftool", "-n", "-json", *names))), "mediainfo": chosen(by_mediainfo(output("mediainfo", "--Output=JSON", *names)))}
     if subprocess.run(["/usr/bin/python3", "-c", "import mutagen"], capture_output=True, check=False).returncode == 0:
         theirs["mutagen"] = chosen(by_mutagen(output("/usr/bin/python3", "-c", MUTAGEN, folder)))
     return abs(len(ours) - len(names)) + sum(tell_fields(program, ours, records, tell) for program, records in theirs.items())

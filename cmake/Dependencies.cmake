@@ -18,3 +18,7 @@ option(KTFILES_WITH_TAGLIB "Build the module of tags" ${taglib_FOUND})
 # Loudness by EBU R 128, in another module; without libebur128 none is measured.
 pkg_check_modules(ebur128 IMPORTED_TARGET libebur128)
 option(KTFILES_WITH_EBUR128 "Build the module that measures loudness" ${ebur128_FOUND})
+
+# The server of pages, in a module of the command; without cpp-httplib no page is served.
+pkg_check_modules(httplib IMPORTED_TARGET cpp-httplib)
+option(KTFILES_WITH_SERVER "Build the module that serves pages" ${httplib_FOUND})

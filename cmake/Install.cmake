@@ -1,5 +1,5 @@
 # What `make install` puts where: the library, its headers by room, the CMake package, the pkg-config file, the command.
-# Components, which are also the packages: runtime, development, command; decoders, tags and loudness where the modules are built.
+# Components, which are also the packages: runtime, development, command; decoders, tags, loudness and server where the modules are built.
 
 include(CMakePackageConfigHelpers)
 
@@ -17,6 +17,10 @@ endif()
 
 if(TARGET ktfiles_loudness)
     install(TARGETS ktfiles_loudness LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR}/ktfiles COMPONENT loudness)
+endif()
+
+if(TARGET ktfiles_server)
+    install(TARGETS ktfiles_server LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR}/ktfiles COMPONENT server)
 endif()
 
 # The headers of implementations (platform/posix/ and the like) are nobody's business.

@@ -1,4 +1,4 @@
-# `cpack -G DEB`: libktfiles0, libktfiles-dev, ktfiles; libktfiles-ffmpeg, libktfiles-taglib, libktfiles-ebur128 and python3-ktfiles where
+# `cpack -G DEB`: libktfiles0, libktfiles-dev, ktfiles; libktfiles-ffmpeg, libktfiles-taglib, libktfiles-ebur128, ktfiles-server and python3-ktfiles where
 # their modules are built.
 
 set(CPACK_PACKAGE_NAME ktfiles)
@@ -68,5 +68,14 @@ set(CPACK_DEBIAN_COMMAND_PACKAGE_NAME ktfiles)
 set(CPACK_DEBIAN_COMMAND_PACKAGE_SECTION sound)
 set(CPACK_DEBIAN_COMMAND_PACKAGE_DEPENDS "libktfiles${PROJECT_VERSION_MAJOR} (= ${PROJECT_VERSION})")
 set(CPACK_COMPONENT_COMMAND_DESCRIPTION "The command ktfiles")
+
+if(TARGET ktfiles_server)
+    list(APPEND CPACK_COMPONENTS_ALL server)
+    set(CPACK_DEBIAN_COMMAND_PACKAGE_RECOMMENDS ktfiles-server)
+    set(CPACK_DEBIAN_SERVER_PACKAGE_NAME ktfiles-server)
+    set(CPACK_DEBIAN_SERVER_PACKAGE_SECTION sound)
+    set(CPACK_DEBIAN_SERVER_PACKAGE_DEPENDS "ktfiles (= ${PROJECT_VERSION})")
+    set(CPACK_COMPONENT_SERVER_DESCRIPTION "The server of pages for the command ktfiles")
+endif()
 
 include(CPack)

@@ -88,7 +88,7 @@ _ktfiles()
                 --rate --channels --format --problem --duplicates --since --sort --reverse --limit --db --fresh --null --csv $common" -- "$cur")) ;;
             page/*) COMPREPLY=($(compgen -W "--tempo --key --related --kind --category --genre --artist --title --album --longer --shorter
                 --rate --channels --format --problem --duplicates --since --sort --reverse --limit
-                --output --heading --previews --embed-previews --force --db $common" -- "$cur")) ;;
+                --output --heading --previews --embed-previews --serve --port --fresh --force --db $common" -- "$cur")) ;;
             index/merge | index/export) COMPREPLY=($(compgen -W "--db $common" -- "$cur")) ;;
             meta/set) COMPREPLY=($(compgen -W "--lenient --loudness --md5 $files $edit $common" -- "$cur")) ;;
             meta/remove) COMPREPLY=($(compgen -W "$files $edit $common" -- "$cur")) ;;

@@ -2,9 +2,13 @@
 #include "tool/page/PageDocument.h"
 #include "tool/page/PagePreviews.h"
 #include "tool/page/PageRow.h"
+#include "tool/page/PageServer.h"
 #include "tool/shared/arguments/CommandLine.h"
+#include "tool/shared/indexing/LibraryUpdate.h"
+#include "tool/shared/library/IndexedName.h"
 #include "tool/shared/library/LibraryQueryOptions.h"
 #include "tool/shared/library/LibrarySearch.h"
+#include "tool/shared/output/FilesProgress.h"
 #include "tool/shared/output/JsonRecords.h"
 #include "tool/shared/output/ShownName.h"
 
@@ -18,9 +22,12 @@ struct PageArguments {
     LibraryQuery query;
     std::string database;
     std::string out;
-    std::string title;
+    std::string heading;
     OutputFile::Existing existing = OutputFile::Existing::refuse;
     bool makesPreviews = false, embedsPreviews = false;
+    bool serves = false;
+    int port = 0; // any that is free
+    bool updatesFirst = false;
 
     bool isToOutput() const { return out == "-"; }
 };
@@ -86,8 +93,8 @@ void tell(const PageArguments& arguments, const std::vector<PageRow>& rows, std:
 
 void checkArguments(const PageArguments& arguments, const OutputOptions& options)
 {
-    if (arguments.out.empty())
-        throw UsageError("-o OUT is missing: the page to write, \"-\" for standard output");
+    if (arguments.out.empty() && !arguments.serves)
+        throw UsageError("-o OUT is missing: the page to write, \"-\" for standard output; or --serve");
     if (arguments.isToOutput() && options.wantsJson())
         throw UsageError("JSON and the page cannot both go to standard output");
     if (arguments.isToOutput() && arguments.makesPreviews)
@@ -101,13 +108,70 @@ bool writePage(const PageArguments& arguments, Library& library, const OutputOpt
     const std::string folder = folderOf(arguments.out);
     std::vector<PageRow> rows = rowsFor(library, arguments.query);
     const bool good = previewsFor(arguments, options.quiet).make(rows);
-    const std::string text = PageDocument{.title = arguments.title, .folder = folder}.text(rows);
+    const std::string text = PageDocument{.title = arguments.heading, .folder = folder}.text(rows);
     if (arguments.isToOutput())
         Output::standard().write(text);
     else
         writeOutputFile(arguments.out, library.path(), arguments.existing, [&](const Sink& sink) { sink(text); });
     tell(arguments, rows, text.size(), options);
     return good;
+}
+
+std::vector<std::string> rootsOf(Library& library)
+{
+    std::vector<std::string> roots;
+    for (SQLStatement rows(library.database(), "SELECT path FROM roots"); rows.step();)
+        roots.push_back(nameOfIndexed(rows.bytes(0)));
+    return roots;
+}
+
+// Says where the page is; false if nobody can hear it.
+bool tellAddress(const std::string& address, std::size_t files, const OutputOptions& options)
+{
+    if (options.wantsJson())
+        writeRecord(options, [&](JsonWriter& json) {
+            json.beginObject().member("address", address).member("files", files).endObject();
+        });
+    else
+        Output::standard().print("{}\n", address);
+    if (!Output::standard().flush())
+        return false;
+    if (!options.quiet && isTerminal(STDERR_FILENO))
+        fmt::print(stderr, "Open it in a browser on this machine. Ctrl-C ends it.\n");
+    return true;
+}
+
+bool servePage(const PageArguments& arguments, Library& library, const OutputOptions& options)
+{
+    const ServerModule* const server = serverModule();
+    if (server == nullptr)
+        throw Failure("pages cannot be served without ktfiles/libktfiles-server.so (install ktfiles-server)");
+    std::vector<PageRow> rows = rowsFor(library, arguments.query);
+    const std::size_t files = rows.size();
+    std::string text = PageDocument{.title = arguments.heading, .folder = {}, .isServed = true}.text(rows);
+    PageSite site(std::move(rows), std::move(text), rootsOf(library));
+    const auto begin = [&](int port) {
+        site.setPort(port);
+        return tellAddress(fmt::format("http://127.0.0.1:{}{}", port, site.path()), files, options);
+    };
+    if (!server->serve(site, arguments.port, begin))
+        throw Failure(fmt::format("port {} of this machine cannot be opened", arguments.port));
+    return true;
+}
+
+// Brings what is in the index up to date, all of it or the folders that are looked in.
+void update(const PageArguments& arguments, const std::string& path, bool quiet)
+{
+    Library library(path, SQLDatabase::Mode::write);
+    std::vector<std::string> folders;
+    for (const LibraryQuery::Scope& scope : arguments.query.scopes)
+        folders.push_back(scope.path);
+    FilesProgress progress("indexing", quiet);
+    LibraryUpdate wanted;
+    wanted.folders = std::move(folders);
+    wanted.tell = [](const std::string& name, const std::string& problem) { reportFailure(shownName(name), problem); };
+    wanted.progress = &progress;
+    updateLibrary(library, wanted);
 }
 
 bool runPage(PageArguments& arguments, const OutputOptions& options)
@@ -118,8 +182,11 @@ bool runPage(PageArguments& arguments, const OutputOptions& options)
     bool good = true;
     return reportingRecord(path, options,
                            [&] {
+                               if (arguments.updatesFirst)
+                                   update(arguments, path, options.quiet);
                                Library library(path, SQLDatabase::Mode::read);
-                               good = writePage(arguments, library, options);
+                               good = arguments.serves ? servePage(arguments, library, options)
+                                                       : writePage(arguments, library, options);
                            }) &&
            good;
 }
@@ -130,16 +197,24 @@ void declarePage(CommandLine& commandLine)
     Verb& verb = commandLine.addVerb("page", "Write a page on which a library is looked at and listened to",
                                      [&commandLine] { return runPage(arguments, commandLine.output()); });
     addQueryOptions(verb, arguments.query);
-    CommandLine::addPath(verb, "-o,--output", arguments.out, "The page to write, \"-\" for standard output")
-        .label("OUT");
-    verb.addText("--heading", arguments.title, "Its heading; else the name of the folder with all sounds")
+    const Argument out =
+        CommandLine::addPath(verb, "-o,--output", arguments.out, "The page to write, \"-\" for standard output")
+            .label("OUT");
+    verb.addText("--heading", arguments.heading, "What stands above it; else the name of the folder of all sounds")
         .label("TEXT");
-    const Argument previews =
+    Argument previews =
         verb.addFlag("--previews", arguments.makesPreviews,
                      "Write previews, 10 seconds at most, beside it for what some browsers do not play");
-    verb.addFlag("--embed-previews", arguments.embedsPreviews, "Put previews into the page, 64 MB at most")
-        .excludes(previews);
+    Argument embedded =
+        verb.addFlag("--embed-previews", arguments.embedsPreviews, "Put previews into the page, 64 MB at most")
+            .excludes(previews);
+    verb.addFlag("--serve", arguments.serves, "Serve the page to browsers on this machine instead, with all sounds")
+        .excludes(out)
+        .excludes(previews)
+        .excludes(embedded);
+    verb.addNumber("--port", arguments.port, {0, 65535}, "The port for --serve; else, or with 0, any that is free");
     CommandLine::addForceOption(verb, arguments.existing);
+    verb.addFlag("--fresh", arguments.updatesFirst, "Bring the index up to date first");
     CommandLine::addPath(verb, "--db", arguments.database, "The index; else that of the user").label("FILE");
 }
 

@@ -148,7 +148,7 @@ function tempoTest(from, to, related) {
     return fields => fields[2] !== null && (isWithin(fields[2]) || (related && (isWithin(fields[2] * 2) || isWithin(fields[2] / 2))));
 }
 
-/** A file that says only the note, or both modes, is in every key on that note. */
+/** A file that is said to go with both modes is in either. */
 function keyTest(key, related, texts) {
     const note = key >> 1, isMinor = (key & 1) === 1, wanted = new Set([key]);
     if (related) {
@@ -159,9 +159,9 @@ function keyTest(key, related, texts) {
         if (fields[4] < 0)
             return false;
         const mode = texts[fields[5]];
-        if (mode === "major" || mode === "minor")
-            return wanted.has(keyNumber(fields[4], mode));
-        return wanted.has(fields[4] * 2) || wanted.has(fields[4] * 2 + 1);
+        if (mode === "both")
+            return wanted.has(fields[4] * 2) || wanted.has(fields[4] * 2 + 1);
+        return wanted.has(keyNumber(fields[4], mode));
     };
 }
 

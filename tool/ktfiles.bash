@@ -55,10 +55,10 @@ _ktfiles()
     esac
 
     if ((cword == 1)); then
-        COMPREPLY=($(compgen -W 'info pair chunks tags meta scan find page overview adm project lock locks decode help --help --version -V' -- "$cur"))
+        COMPREPLY=($(compgen -W 'info pair chunks tags meta scan index find page overview adm project lock locks decode help --help --version -V' -- "$cur"))
     elif [[ $verb == help ]]; then
         if ((cword == 2)); then
-            COMPREPLY=($(compgen -W 'info pair chunks tags meta scan find page overview adm project lock locks decode' -- "$cur"))
+            COMPREPLY=($(compgen -W 'info pair chunks tags meta scan index find page overview adm project lock locks decode' -- "$cur"))
         elif ((cword == 3)) && [[ $object == chunks ]]; then
             COMPREPLY=($(compgen -W 'get add remove' -- "$cur"))
         elif ((cword == 3)) && [[ $object == tags ]]; then
@@ -83,6 +83,7 @@ _ktfiles()
             decode/*) COMPREPLY=($(compgen -W "--output --format --rate --channels --bits --start --end --frames --conceal
                 --force --threads $files $common" -- "$cur")) ;;
             lock/*) COMPREPLY=($(compgen -W "--read --write --presenter --timeout -- $common" -- "$cur")) ;;
+            index/*) COMPREPLY=($(compgen -W "--db --hash --no-overview --prune --watch --shard --threads $files $common" -- "$cur")) ;;
             scan/*) COMPREPLY=($(compgen -W "--csv --threads $files $common" -- "$cur")) ;;
             find/*) COMPREPLY=($(compgen -W "--tempo --key --related --kind --category --genre --artist --title --album --longer --shorter
                 --rate --channels --format --problem --duplicates --since --sort --reverse --limit --db --fresh --null --csv $common" -- "$cur")) ;;
@@ -114,7 +115,7 @@ _ktfiles()
         for id in "${ids[@]%%*( )}"; do
             [[ $id == "$cur"* ]] && COMPREPLY+=("$(printf %q "$id")")
         done
-    elif [[ $verb == scan ]]; then
+    elif [[ $verb == @(scan|index) ]]; then
         _filedir -d
     elif [[ $verb == project ]]; then
         _filedir -d

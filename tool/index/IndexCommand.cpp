@@ -2,6 +2,7 @@
 #include "tool/index/EndOfWork.h"
 #include "tool/index/IndexObjects.h"
 #include "tool/index/IndexRecords.h"
+#include "tool/index/IndexWatch.h"
 #include "tool/shared/arguments/CommandLine.h"
 #include "tool/shared/arguments/ThreadsOption.h"
 #include "tool/shared/indexing/LibraryUpdate.h"
@@ -24,6 +25,7 @@ struct IndexArguments {
     bool omitsOverviews = false;
     bool prunes = false;
     bool writesRecords = false;
+    bool watches = false;
     unsigned threads = 0;
     LibraryShard shard;
 };
@@ -61,20 +63,48 @@ std::string summary(const LibraryChanges& changes)
                     grouped(changes.changed), grouped(changes.moved), grouped(changes.removed), grouped(changes.same));
     if (changes.unreadable > 0)
         text += fmt::format(", {} unreadable", grouped(changes.unreadable));
+    if (changes.loops > 0)
+        text += fmt::format("; {} of those read {}", grouped(changes.loops),
+                            changes.loops == 1 ? "is a loop" : "are loops");
     return text;
 }
 
-void writeChanges(const LibraryChanges& changes, const std::string& path, const OutputOptions& options)
-{
-    const std::string shown = shownName(path);
-    writeRecord(options, [&](JsonWriter& json) {
-        json.beginObject().member("database", shown);
+// Tells what an update changed: a record, and for people a line.
+class ChangesWriter {
+public:
+    ChangesWriter(const std::string& database, const OutputOptions& options)
+        : database_(shownName(database)),
+          options_(options),
+          records_(options)
+    {
+    }
+
+    void add(const LibraryChanges& changes)
+    {
+        if (options_.wantsJson())
+            addRecord(changes);
+        if (options_.quiet || !isTerminal(STDERR_FILENO))
+            return;
+        const progressline::Cleared cleared;
+        fmt::print(stderr, "{}; {}\n", summary(changes), printable(database_));
+    }
+    void finish() { records_.finish(); }
+
+private:
+    void addRecord(const LibraryChanges& changes)
+    {
+        JsonWriter& json = records_.begin().beginObject().member("database", database_);
         json.member("added", changes.added).member("changed", changes.changed).member("moved", changes.moved);
         json.member("removed", changes.removed).member("unchanged", changes.same);
         json.member("passedOver", changes.passedOver).member("unreadable", changes.unreadable);
-        json.member("problems", changes.problems).endObject();
-    });
-}
+        json.member("loops", changes.loops).member("problems", changes.problems).endObject();
+        records_.end();
+    }
+
+    std::string database_;
+    const OutputOptions& options_;
+    JsonRecords records_;
+};
 
 LibraryUpdate updateFor(const IndexArguments& arguments)
 {
@@ -90,19 +120,25 @@ LibraryUpdate updateFor(const IndexArguments& arguments)
     return update;
 }
 
-LibraryChanges updateIndex(Library& library, LibraryUpdate update, bool quiet)
+// Whether no problem was met.
+bool updateIndex(Library& library, LibraryUpdate update, const OutputOptions& options, ChangesWriter& writer)
 {
-    FilesProgress progress("indexing", quiet);
-    update.progress = &progress;
-    return updateLibrary(library, update);
+    LibraryChanges changes;
+    {
+        FilesProgress progress("indexing", options.quiet);
+        update.progress = &progress;
+        changes = updateLibrary(library, update);
+    }
+    writer.add(changes);
+    return changes.problems == 0;
 }
 
 bool runRecords(const IndexArguments& arguments, LibraryUpdate update, const OutputOptions& options)
 {
     if (update.folders.empty())
         throw MissingArgument(arguments.folders.label);
-    if (!arguments.database.empty() || arguments.prunes)
-        throw UsageError("--records needs no index: --db and --prune are for one");
+    if (!arguments.database.empty() || arguments.prunes || arguments.watches)
+        throw UsageError("--records needs no index: --db, --prune and --watch are for one");
     const EndOfWork ending;
     const bool isGood = writeIndexRecords(std::move(update), options);
     EndOfWork::endIfAsked();
@@ -119,20 +155,20 @@ bool runIndex(const IndexArguments& arguments, const OutputOptions& options)
     const std::string path = arguments.database.empty() ? defaultLibrary() : arguments.database;
     if (update.folders.empty() && ::access(path.c_str(), F_OK) != 0)
         throw MissingArgument(arguments.folders.label);
-    std::optional<LibraryChanges> changes;
+    if (arguments.watches && arguments.shard.count > 1)
+        throw UsageError("--watch follows all files: it goes without --shard");
     const EndOfWork ending;
-    const bool wasWritten = reportingFailures(path, [&] {
+    ChangesWriter writer(path, options);
+    bool isGood = false;
+    const bool isWritten = reportingFailures(path, [&] {
         Library library(path, SQLDatabase::Mode::create);
-        changes = updateIndex(library, std::move(update), options.quiet);
+        isGood = arguments.watches ? watchIndex(library, std::move(update),
+                                                [&](const LibraryChanges& changes) { writer.add(changes); })
+                                   : updateIndex(library, std::move(update), options, writer);
     });
-    if (wasWritten && options.wantsJson())
-        writeChanges(*changes, path, options);
-    if (wasWritten && !options.quiet && isTerminal(STDERR_FILENO)) {
-        const progressline::Cleared cleared;
-        fmt::print(stderr, "{}; {}\n", summary(*changes), printable(shownName(path)));
-    }
+    writer.finish();
     EndOfWork::endIfAsked();
-    return wasWritten && changes->problems == 0;
+    return isWritten && isGood;
 }
 
 void declareIndex(CommandLine& commandLine)
@@ -146,6 +182,7 @@ void declareIndex(CommandLine& commandLine)
     verb.addFlag("--hash", arguments.hashes, "Hash the sound too, which finds duplicates");
     verb.addFlag("--no-overview", arguments.omitsOverviews, "Keep no waveforms, for which all samples are read");
     verb.addFlag("--prune", arguments.prunes, "Forget what lies in folders that are not there, or are empty");
+    verb.addFlag("--watch", arguments.watches, "Go on, and follow what changes in the folders");
     const auto takeShard = [](const std::string& text) {
         arguments.shard = shardFromText(text).value_or(LibraryShard());
     };

@@ -108,8 +108,10 @@ void listFolder(FolderListing& listing, const std::function<bool(const FolderLis
         listing.isGone = errno == ENOENT || errno == ENOTDIR;
         return;
     }
+    struct stat above = {};
     listing.device = status.st_dev;
     listing.inode = status.st_ino;
+    listing.isMount = ::fstatat(folder.get(), "..", &above, 0) == 0 && above.st_dev != status.st_dev;
     if (!isWanted(listing)) {
         listing.isWhole = false;
         return;
@@ -118,6 +120,13 @@ void listFolder(FolderListing& listing, const std::function<bool(const FolderLis
     listing.isWhole = listing.error == 0;
     std::ranges::sort(listing.files, {}, &ListedFile::text);
     std::ranges::sort(listing.uncertain);
+}
+
+bool isMountPoint(const std::string& folder)
+{
+    struct stat status = {}, above = {};
+    return ::stat(folder.c_str(), &status) == 0 && ::stat((folder + "..").c_str(), &above) == 0 &&
+           status.st_dev != above.st_dev;
 }
 
 std::optional<SeenStamp> stampOfFile(const std::string& path)

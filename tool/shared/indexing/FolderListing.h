@@ -31,9 +31,10 @@ struct FolderListing {
     std::vector<std::string> missing;   // names of files that were named by themselves and are not there
     std::uint64_t device = 0, inode = 0;
     bool isRoot = false;
-    bool isWhole = true; // otherwise files that are not listed may be there
-    bool isGone = false; // there is no such folder
-    int error = 0;       // of the system, for a folder that could not be read to its end; then it is not whole
+    bool isMount = false; // a file system begins here
+    bool isWhole = true;  // otherwise files that are not listed may be there
+    bool isGone = false;  // there is no such folder
+    int error = 0;        // of the system, for a folder that could not be read to its end; then it is not whole
 
     /// The path of a file or of the folder itself below its root.
     std::string below(const std::string& name = {}) const { return words.substr(rootLength) + name; }
@@ -42,6 +43,8 @@ struct FolderListing {
 /// Lists the folder at `listing.path`: regular files, and links to such; names that begin with a dot are left out.
 /// Lists nothing if `isWanted`, which finds device and inode filled in, says so.
 void listFolder(FolderListing& listing, const std::function<bool(const FolderListing&)>& isWanted);
+/// Whether a file system begins at the folder.
+bool isMountPoint(const std::string& folder);
 /// The stamp of a regular file, or of the one that a link leads to; none if there is none, with `errno` set.
 std::optional<SeenStamp> stampOfFile(const std::string& path);
 /// Adds a file that was named by itself to those of its folder, which is not whole. False if it is not there.

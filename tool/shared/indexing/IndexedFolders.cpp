@@ -53,6 +53,7 @@ IndexedFolders::IndexedFolders(SQLDatabase& database)
       file_(database, "SELECT s.name, s.size, s.modified, s.changed, s.inode, s.file IS NOT NULL "
                       "FROM folders d JOIN seen s ON s.folder = d.id WHERE d.path = ? AND s.name = ?"),
       folders_(database, "SELECT path FROM folders WHERE path >= ? AND path < ?"),
+      mounts_(database, "SELECT path FROM folders WHERE mounted = 1 AND path >= ? AND path < ?"),
       anyBelow_(database, "SELECT 1 FROM folders d WHERE path >= ? AND path < ? "
                           "AND EXISTS (SELECT 1 FROM seen s WHERE s.folder = d.id) LIMIT 1"),
       inodes_(database, "SELECT d.path, s.name, s.size, s.modified, s.changed, s.inode "
@@ -114,6 +115,22 @@ std::vector<std::string> IndexedFolders::foldersBelow(const std::string& folder)
     while (folders_.step())
         paths.push_back(nameOfIndexed(folders_.bytes(0)));
     return paths;
+}
+
+std::vector<std::string> IndexedFolders::mountsBelow(const std::string& folder)
+{
+    const std::string text = indexedName(folder), end = endOfFolder(text);
+    std::vector<std::string> paths;
+    mounts_.bind(1, std::string_view(text)).bind(2, std::string_view(end));
+    while (mounts_.step())
+        paths.push_back(nameOfIndexed(mounts_.bytes(0)));
+    return paths;
+}
+
+bool IndexedFolders::isMount(const std::string& folder)
+{
+    const std::vector<std::string> mounts = mountsBelow(folder);
+    return std::ranges::find(mounts, folder) != mounts.end();
 }
 
 bool IndexedFolders::knowsBelow(const std::string& folder)

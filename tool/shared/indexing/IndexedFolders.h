@@ -41,6 +41,9 @@ public:
     std::optional<KnownFile> fileAt(const std::string& folder, const std::string& name);
     /// The folder itself, and those below it.
     std::vector<std::string> foldersBelow(const std::string& folder);
+    /// Where file systems were mounted: the folder itself, and those below it.
+    std::vector<std::string> mountsBelow(const std::string& folder);
+    bool isMount(const std::string& folder);
     /// Whether anything is known of the folder and of those below it.
     bool knowsBelow(const std::string& folder);
     /// Audio that may be the same as this file: of equal inode, size and time.
@@ -51,7 +54,7 @@ public:
 
 private:
     SQLDatabase& database_;
-    SQLStatement files_, file_, folders_, anyBelow_, inodes_, root_;
+    SQLStatement files_, file_, folders_, mounts_, anyBelow_, inodes_, root_;
     std::vector<std::pair<std::string, std::string>> own_; // folders and texts
     std::vector<std::int64_t> ownInodes_;
 };

@@ -3,8 +3,10 @@
 #include "platform/core/CRC32.h"
 #include "tool/shared/indexing/IndexedFolders.h"
 #include "tool/shared/indexing/ReadingPool.h"
+#include "tool/shared/indexing/StorageKind.h"
 #include "tool/shared/indexing/UpdateBatch.h"
 #include "tool/shared/indexing/UpdateStarts.h"
+#include "tool/shared/input/FoundFile.h"
 #include "tool/shared/library/IndexedName.h"
 #include "tool/shared/output/FilesProgress.h"
 
@@ -19,7 +21,8 @@ using UpdateClock = std::chrono::steady_clock;
 
 // What is read ahead of the writer.
 constexpr std::size_t kMostPending = 4'000;
-constexpr unsigned kWalkers = 2;
+// Folders that are gone through at once; where each question takes its time, more.
+constexpr unsigned kWalkers = 2, kNetworkWalkers = 16;
 constexpr std::chrono::milliseconds kLookAround{20};
 
 class LibraryUpdating {
@@ -30,6 +33,7 @@ public:
 
 private:
     void begin();
+    void beginWithChanged();
     void gather();
     void compare(FolderListing listing);
     void compareNew(const std::shared_ptr<const FolderListing>& folder, std::size_t file);
@@ -37,8 +41,10 @@ private:
     bool isMine(const FolderListing& folder, const std::string& text) const;
     void noteVanished(const std::string& folder, KnownFile file);
     void noteVanishedBelow(const std::string& path);
+    void tellUncertain(const FolderListing& folder, const std::string& text);
     bool isKept(const std::string& path) const;
     void tellAbsent();
+    void tellUnmounted();
     void keep(const std::string& path, const std::string& problem);
     void tell(const std::string& path, const std::string& problem);
     void finish();
@@ -49,6 +55,7 @@ private:
     IndexedFolders known_;
     UpdateBatch batch_;
     UpdateStarts starts_;
+    std::vector<std::string> whole_;          // what is known below these and not met is gone
     std::unordered_set<std::string> visited_; // folders
     std::vector<std::string> kept_;           // folders that could not be looked into: what is below them stays
     std::vector<VanishedFile> vanished_;
@@ -79,11 +86,29 @@ LibraryChanges LibraryUpdating::run()
 
 void LibraryUpdating::begin()
 {
-    starts_ = updateStarts(update_.folders.empty() ? known_.roots() : update_.folders);
-    tellAbsent();
-    std::erase_if(starts_.walks, [&](const WalkStart& start) { return start.files.empty() && isKept(start.path); });
-    batch_.addRoots(starts_.roots);
-    walk_.emplace(inbox_, starts_.walks, kWalkers);
+    if (!update_.changed.empty()) {
+        beginWithChanged();
+    } else {
+        starts_ = updateStarts(update_.folders.empty() ? known_.roots() : update_.folders);
+        tellAbsent();
+        whole_ = starts_.roots;
+        if (update_.prunes)
+            whole_.insert(whole_.end(), starts_.absent.begin(), starts_.absent.end());
+        batch_.addRoots(starts_.roots);
+    }
+    tellUnmounted();
+    const bool isSlow =
+        std::ranges::any_of(starts_.walks, [](const WalkStart& start) { return isOnNetwork(start.path); });
+    walk_.emplace(inbox_, starts_.walks, isSlow ? kNetworkWalkers : kWalkers, update_.opened);
+}
+
+void LibraryUpdating::beginWithChanged()
+{
+    for (const ChangedFolder& folder : update_.changed) {
+        starts_.walks.push_back({folder.path, folder.words, {}, folder.rootLength, !folder.isWhole});
+        if (folder.isWhole)
+            whole_.push_back(folder.path);
+    }
 }
 
 // The walk, the readers and this thread work at once. This one compares what is found with what is known, and writes.
@@ -121,7 +146,9 @@ void LibraryUpdating::compare(FolderListing found)
         return;
     if (found.error != 0)
         keep(found.path, SystemErrorText(found.error));
-    if (found.isRoot && found.isWhole && found.files.empty() && found.folders.empty() &&
+    if (found.isMount && !known_.isMount(found.path))
+        batch_.noteMount(found.path, found.words, true);
+    if (found.isRoot && found.isWhole && !isKept(found.path) && found.files.empty() && found.folders.empty() &&
         known_.knowsBelow(found.path) && !update_.prunes)
         return keep(found.path, "is empty, as where a volume is not mounted; what the index knows of it is kept");
     if (found.isWhole)
@@ -132,7 +159,9 @@ void LibraryUpdating::compare(FolderListing found)
     auto row = known.begin();
     const auto passRow = [&] {
         const bool isUncertain = std::ranges::binary_search(folder->uncertain, row->text);
-        if (folder->isWhole && !isUncertain && isMine(*folder, row->text))
+        if (isUncertain)
+            tellUncertain(*folder, row->text);
+        else if (folder->isWhole && isMine(*folder, row->text))
             noteVanished(folder->path, *row);
         ++row;
     };
@@ -158,6 +187,9 @@ void LibraryUpdating::compare(FolderListing found)
     }
     while (row != known.end())
         passRow();
+    for (const std::string& text : folder->uncertain) // a dangling link matters only if its name is that of sound
+        if (isCalledAudio(text) && !std::ranges::binary_search(known, text, {}, &KnownFile::text))
+            tellUncertain(*folder, text);
     for (const std::string& name : folder->missing)
         if (const auto lost = known_.fileAt(folder->path, name))
             noteVanished(folder->path, *lost);
@@ -200,6 +232,8 @@ bool LibraryUpdating::isMine(const FolderListing& folder, const std::string& tex
 
 void LibraryUpdating::noteVanished(const std::string& folder, KnownFile file)
 {
+    if (isKept(folder))
+        return;
     vanished_.push_back({folder, std::move(file.text), file.stamp});
 }
 
@@ -218,7 +252,7 @@ void LibraryUpdating::tell(const std::string& path, const std::string& problem)
 void LibraryUpdating::keep(const std::string& path, const std::string& problem)
 {
     kept_.push_back(path);
-    tell(path, problem);
+    tell(path.size() > 1 && path.ends_with('/') ? path.substr(0, path.size() - 1) : path, problem);
 }
 
 void LibraryUpdating::tellAbsent()
@@ -229,10 +263,29 @@ void LibraryUpdating::tellAbsent()
         if (const auto file = known_.fileAt(name.substr(0, slash + 1), name.substr(slash + 1)))
             noteVanished(name.substr(0, slash + 1), *file);
         else if (!known_.knowsBelow(path) && !known_.isRoot(path))
-            keep(name, SystemErrorText(ENOENT));
+            tell(name, SystemErrorText(ENOENT));
         else if (!update_.prunes)
             keep(path, "is not there; what the index knows of it is kept (--prune removes it)");
     }
+}
+
+// Where a file system was mounted, and none is, its files may come back.
+void LibraryUpdating::tellUnmounted()
+{
+    for (const std::string& whole : whole_)
+        for (const std::string& path : known_.mountsBelow(whole)) {
+            if (isMountPoint(path) || isKept(path))
+                continue;
+            if (update_.prunes)
+                batch_.noteMount(path, {}, false);
+            else
+                keep(path, "is not mounted; what the index knows of it is kept (--prune removes it)");
+        }
+}
+
+void LibraryUpdating::tellUncertain(const FolderListing& folder, const std::string& text)
+{
+    tell(folder.path + nameOfIndexed(text), "cannot be looked at, or is a link that leads nowhere");
 }
 
 // Folders that the index knows, and that the walk did not come by.
@@ -249,12 +302,9 @@ void LibraryUpdating::noteVanishedBelow(const std::string& path)
 
 void LibraryUpdating::finish()
 {
-    for (const std::string& root : starts_.roots)
-        if (!isKept(root))
-            noteVanishedBelow(root);
-    for (const std::string& root : starts_.absent)
-        if (!isKept(root) && update_.prunes)
-            noteVanishedBelow(root);
+    for (const std::string& folder : whole_)
+        if (!isKept(folder))
+            noteVanishedBelow(folder);
     batch_.remove(std::move(vanished_));
     std::vector<std::string> complete, absent;
     for (const std::string& root : starts_.roots)

@@ -18,17 +18,21 @@ std::string resolvedFolder(const std::string& path)
 
 } // namespace
 
-LibraryWalk::LibraryWalk(UpdateInbox& inbox, std::vector<WalkStart> starts, unsigned threads) : inbox_(inbox)
+LibraryWalk::LibraryWalk(UpdateInbox& inbox, std::vector<WalkStart> starts, unsigned threads,
+                         std::function<void(const FolderListing&)> opened)
+    : inbox_(inbox),
+      opened_(std::move(opened))
 {
     for (WalkStart& start : starts | std::views::reverse) {
         FolderListing listing;
         listing.path = start.path;
         listing.words = start.words;
-        listing.isRoot = start.files.empty();
-        listing.rootLength = start.words.size();
-        if (start.files.empty())
-            roots_.push_back(start.path);
-        tasks_.push_back({std::move(listing), std::move(start.files)});
+        listing.isRoot = start.files.empty() && start.rootLength == 0;
+        listing.rootLength = start.rootLength == 0 ? start.words.size() : start.rootLength;
+        const std::string below = start.words.substr(listing.rootLength);
+        if (start.files.empty() && start.path.ends_with(below))
+            roots_.push_back(start.path.substr(0, start.path.size() - below.size()));
+        tasks_.push_back({std::move(listing), std::move(start.files), start.isAlone});
     }
     if (tasks_.empty()) {
         inbox_.endListings();
@@ -79,10 +83,16 @@ bool LibraryWalk::visit(Task& task)
     FolderListing& listing = task.listing;
     if (task.files.empty()) {
         bool isVisited = false;
-        listFolder(listing, [&](const FolderListing& opened) { return !(isVisited = !isNew(opened)); });
+        listFolder(listing, [&](const FolderListing& opened) {
+            isVisited = !isNew(opened);
+            if (!isVisited && opened_)
+                opened_(opened);
+            return !isVisited;
+        });
         if (isVisited)
             return true;
-        addFolders(listing);
+        if (!task.isAlone)
+            addFolders(listing);
     } else {
         for (const std::string& name : task.files)
             if (!listFile(listing, name))
@@ -104,7 +114,7 @@ void LibraryWalk::addFolders(const FolderListing& listing)
             if (next.path.empty() || leadsInside(next.path))
                 continue;
         }
-        tasks.push_back({std::move(next), {}});
+        tasks.push_back({std::move(next), {}, false});
     }
     if (tasks.empty())
         return;

@@ -4,6 +4,7 @@
 #include "tool/shared/indexing/UpdateInbox.h"
 
 #include <condition_variable>
+#include <functional>
 #include <mutex>
 #include <set>
 #include <string>
@@ -11,18 +12,23 @@
 #include <utility>
 #include <vector>
 
-/// Where a walk begins: a root, or files of one folder that were named by themselves.
+/// Where a walk begins: a root, or files of one folder that were named by themselves, or a folder that has changed.
 struct WalkStart {
     std::string path; // of the folder: absolute, links resolved, with a slash at the end
     std::string words;
-    std::vector<std::string> files; // none for a root
+    std::vector<std::string> files = {}; // none for a folder
+    std::size_t rootLength = 0;          // as in FolderListing, of a folder below a root; 0 for a root
+    bool isAlone = false;                // the folders in it are not gone through
 };
 
 /// Leaves a listing of each folder in the inbox, in no order. A folder is visited once. A link to a folder is followed
 /// if it leads out of all roots, and the folder has the path that it leads to.
 class LibraryWalk {
 public:
-    LibraryWalk(UpdateInbox& inbox, std::vector<WalkStart> starts, unsigned threads);
+    ///
+    /// `opened` is called by the threads of the walk for each folder before its entries are read; empty for none.
+    LibraryWalk(UpdateInbox& inbox, std::vector<WalkStart> starts, unsigned threads,
+                std::function<void(const FolderListing&)> opened = {});
     /// Ends the walk.
     ~LibraryWalk();
 
@@ -30,6 +36,7 @@ private:
     struct Task {
         FolderListing listing;
         std::vector<std::string> files;
+        bool isAlone = false;
     };
 
     void work();
@@ -39,6 +46,7 @@ private:
     bool leadsInside(const std::string& path) const;
 
     UpdateInbox& inbox_;
+    std::function<void(const FolderListing&)> opened_;
     std::vector<std::string> roots_;
 
     std::mutex mutex_;

@@ -1,12 +1,16 @@
 #include "tool/shared/indexing/ReadingPool.h"
 
+#include "platform/OwnedDescriptor.h"
 #include "tool/shared/arguments/ThreadsOption.h"
 #include "tool/shared/library/IndexedName.h"
 #include "tool/shared/threads/StartedThread.h"
 
 #include <algorithm>
+#include <array>
 #include <ctime>
+#include <fcntl.h>
 #include <new>
+#include <unistd.h>
 
 namespace {
 
@@ -21,6 +25,14 @@ double processorSeconds()
     return static_cast<double>(time.tv_sec) + 1e-9 * static_cast<double>(time.tv_nsec);
 }
 
+// What the system refuses today may be given tomorrow, without any change of the file.
+bool isReadable(const std::string& path)
+{
+    std::array<char, 1> byte;
+    const platform::OwnedDescriptor file(::open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK | O_NOCTTY));
+    return file && ::read(file.get(), byte.data(), byte.size()) >= 0;
+}
+
 FileReading readJob(ReadingJob job, const LibraryReading& reading)
 {
     FileReading result;
@@ -29,6 +41,8 @@ FileReading readJob(ReadingJob job, const LibraryReading& reading)
         const ListedFile& file = result.job.listed();
         const FilePlace place{result.job.folder->path, nameOfIndexed(file.text)};
         result.record = readLibraryRecord(place, file.stamp, reading);
+        if (result.record && result.record->state == "unreadable" && !isReadable(place.path()))
+            result.record->stamp.changed = result.record->stamp.inode = 0;
         result.isThere = result.record || stampOfFile(place.path()) == file.stamp;
     } catch (const std::bad_alloc&) {
         result.isOutOfMemory = true;

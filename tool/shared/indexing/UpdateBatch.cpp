@@ -3,7 +3,6 @@
 #include "tool/shared/library/IndexedName.h"
 
 #include <ctime>
-#include <set>
 #include <span>
 
 namespace {
@@ -51,6 +50,14 @@ void UpdateBatch::move(VanishedFile from, ReadingJob to)
 {
     moves_.push_back({std::move(from), std::move(to)});
     noteWork();
+}
+
+void UpdateBatch::noteMount(const std::string& path, const std::string& words, bool isMounted)
+{
+    SQLTransaction transaction(library_.database());
+    writer_.begin();
+    writer_.setMounted(isMounted ? writer_.addFolder(path, words) : writer_.folderAt(path), isMounted);
+    transaction.commit();
 }
 
 std::vector<ReadingJob> UpdateBatch::write()
@@ -123,30 +130,29 @@ void UpdateBatch::remove(std::vector<VanishedFile> files)
         rest = rest.subspan(some.size());
         SQLTransaction transaction(library_.database());
         writer_.begin();
-        std::set<std::int64_t> folders;
         for (const VanishedFile& file : some) {
             const std::int64_t folder = writer_.folderAt(file.folder);
             if (folder == 0 || !isAsKnown(folder, file) || !file.isGone())
                 continue;
             const bool wasAudio = writer_.remove(folder, nameOfIndexed(file.text));
             changes_.removed += wasAudio ? 1 : 0;
-            folders.insert(folder);
         }
-        for (const std::int64_t folder : folders)
-            writer_.removeEmptyFolder(folder);
         transaction.commit();
     }
 }
 
 void UpdateBatch::finish(const std::vector<std::string>& complete, const std::vector<std::string>& gone)
 {
+    if (complete.empty() && gone.empty() && changes_.areNone())
+        return;
     SQLTransaction transaction(library_.database());
+    if (changes_.moved + changes_.removed > 0)
+        writer_.removeEmptyFolders();
     for (const std::string& path : complete)
         writer_.completeRoot(writer_.addRoot(path), std::time(nullptr));
     for (const std::string& path : gone)
         writer_.removeRoot(path);
     transaction.commit();
-    const bool wasRead = changes_.added + changes_.changed + changes_.moved + changes_.removed > 0;
-    if (wasRead)
+    if (!changes_.areNone())
         library_.database().run("PRAGMA optimize; PRAGMA wal_checkpoint(TRUNCATE)");
 }

@@ -20,6 +20,8 @@ public:
     void put(FileReading reading);
     /// A file has moved, if nobody else has seen to it when this is written.
     void move(VanishedFile from, ReadingJob to);
+    /// Notes that a file system is mounted at a folder, or is none any more.
+    void noteMount(const std::string& path, const std::string& words, bool isMounted);
     /// When there is something to be written for long enough, or enough of it.
     std::chrono::steady_clock::time_point due() const { return due_; }
     /// Writes it; returns files that have not moved, and must be read.

@@ -12,13 +12,6 @@ std::string withSlash(std::string path)
     return path.ends_with('/') ? path : path + "/";
 }
 
-// The last name of a folder's path, with its slash.
-std::string lastName(const std::string& folder)
-{
-    const std::size_t slash = folder.size() < 2 ? folder.npos : folder.rfind('/', folder.size() - 2);
-    return slash == folder.npos ? folder : folder.substr(slash + 1);
-}
-
 // Whether a walk from the root comes by the folder.
 bool isWalkedFrom(const std::string& root, const std::string& folder)
 {
@@ -27,6 +20,12 @@ bool isWalkedFrom(const std::string& root, const std::string& folder)
 }
 
 } // namespace
+
+std::string lastName(const std::string& folder)
+{
+    const std::size_t slash = folder.size() < 2 ? folder.npos : folder.rfind('/', folder.size() - 2);
+    return slash == folder.npos ? folder : folder.substr(slash + 1);
+}
 
 UpdateStarts updateStarts(const std::vector<std::string>& names)
 {

@@ -14,3 +14,5 @@ struct UpdateStarts {
 
 /// Roots inside others are walked with these.
 UpdateStarts updateStarts(const std::vector<std::string>& names);
+/// The last name of a folder's path, with its slash.
+std::string lastName(const std::string& folder);

@@ -21,7 +21,8 @@ CREATE TABLE roots(
 CREATE TABLE folders(
     id INTEGER PRIMARY KEY,
     path TEXT NOT NULL UNIQUE,    -- absolute, links resolved, with a slash at the end
-    words TEXT NOT NULL           -- the part that a search for words looks at: from the name of the root on
+    words TEXT NOT NULL,          -- the part that a search for words looks at: from the name of the root on
+    mounted INTEGER NOT NULL DEFAULT 0 -- 1: a file system began here when it was last looked at
 );
 -- The audio files.
 CREATE TABLE files(
@@ -93,6 +94,7 @@ CREATE TABLE details(
     fields TEXT,                  -- an array of objects with name, value, and perhaps words
     tags TEXT                     -- an object
 );
+CREATE INDEX mounted_folders ON folders(path) WHERE mounted = 1;
 CREATE INDEX seen_by_inode ON seen(inode) WHERE file IS NOT NULL; -- to find what has moved
 -- Each order of a search has an index that ends with it, and each number or name that it asks for one that begins with
 -- it; the row stands behind all.

@@ -128,13 +128,19 @@ std::int64_t LibraryWriter::folderAt(const std::string& path)
     return folder;
 }
 
-void LibraryWriter::removeEmptyFolder(std::int64_t folder)
+void LibraryWriter::setMounted(std::int64_t folder, bool isMounted)
 {
-    SQLStatement(library_.database(),
-                 "DELETE FROM folders WHERE id = ?1 AND NOT EXISTS (SELECT 1 FROM seen WHERE folder = ?1) "
-                 "AND NOT EXISTS (SELECT 1 FROM files WHERE folder = ?1)")
-        .bind(1, folder)
+    SQLStatement(library_.database(), "UPDATE folders SET mounted = ? WHERE id = ?")
+        .bind(1, std::int64_t{isMounted})
+        .bind(2, folder)
         .run();
+}
+
+void LibraryWriter::removeEmptyFolders()
+{
+    library_.database().run("DELETE FROM folders WHERE mounted = 0 AND "
+                            "NOT EXISTS (SELECT 1 FROM seen WHERE folder = folders.id) AND "
+                            "NOT EXISTS (SELECT 1 FROM files WHERE folder = folders.id)");
     folders_.clear();
 }
 

@@ -26,8 +26,10 @@ public:
 
     /// The row of a folder; 0 for none.
     std::int64_t folderAt(const std::string& path);
-    /// Forgets a folder if nothing is known of what is in it.
-    void removeEmptyFolder(std::int64_t folder);
+    /// Notes whether a file system is mounted at a folder.
+    void setMounted(std::int64_t folder, bool isMounted);
+    /// Forgets the folders of whose files nothing is known, but not where file systems were mounted.
+    void removeEmptyFolders();
 
     /// Adds an audio file, or puts it in the place of what was known of the file of that place; the row stays the
     /// same. Returns the row.

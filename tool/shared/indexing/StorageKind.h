@@ -1,0 +1,8 @@
+// Where folders lie: storage of this machine, or another's.
+#pragma once
+
+#include <string>
+
+/// Whether a file system of another machine, or one that a program provides, holds the folder: changes that others make
+/// there are not announced here, and each question takes its time.
+bool isOnNetwork(const std::string& folder);

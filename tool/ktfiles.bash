@@ -83,7 +83,6 @@ _ktfiles()
             decode/*) COMPREPLY=($(compgen -W "--output --format --rate --channels --bits --start --end --frames --conceal
                 --force --threads $files $common" -- "$cur")) ;;
             lock/*) COMPREPLY=($(compgen -W "--read --write --presenter --timeout -- $common" -- "$cur")) ;;
-            index/*) COMPREPLY=($(compgen -W "--db --hash --no-overview --prune --watch --shard --threads $files $common" -- "$cur")) ;;
             scan/*) COMPREPLY=($(compgen -W "--csv --threads $files $common" -- "$cur")) ;;
             find/*) COMPREPLY=($(compgen -W "--tempo --key --related --kind --category --genre --artist --title --album --longer --shorter
                 --rate --channels --format --problem --duplicates --since --sort --reverse --limit --db --fresh --null --csv $common" -- "$cur")) ;;
@@ -91,6 +90,7 @@ _ktfiles()
                 --rate --channels --format --problem --duplicates --since --sort --reverse --limit
                 --output --heading --previews --embed-previews --serve --port --fresh --force --db $common" -- "$cur")) ;;
             index/merge | index/export) COMPREPLY=($(compgen -W "--db $common" -- "$cur")) ;;
+            index/*) COMPREPLY=($(compgen -W "--db --hash --no-overview --prune --watch --shard --records --threads $files $common" -- "$cur")) ;;
             meta/set) COMPREPLY=($(compgen -W "--lenient --loudness --md5 $files $edit $common" -- "$cur")) ;;
             meta/remove) COMPREPLY=($(compgen -W "$files $edit $common" -- "$cur")) ;;
             meta/copy) COMPREPLY=($(compgen -W "--only --lenient $files $edit $common" -- "$cur")) ;;

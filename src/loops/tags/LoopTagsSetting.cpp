@@ -75,10 +75,10 @@ void sortAsFilesHaveIt(platform::Array& list, LoopTagField::Kind kind)
         return text != nullptr ? std::string_view(*text) : std::string_view();
     };
     std::ranges::stable_sort(list, {}, textOf);
-    const auto repeated = std::ranges::unique(list, [&](const Value& a, const Value& b) {
+    const auto isRepeated = [&](const Value& a, const Value& b) {
         return a.get<std::string>() != nullptr && b.get<std::string>() != nullptr && textOf(a) == textOf(b);
-    });
-    list.erase(repeated.begin(), repeated.end());
+    };
+    list.erase(std::unique(list.begin(), list.end(), isRepeated), list.end());
 }
 
 bool isPossible(const LoopTagAssignment& assignment)

@@ -1,5 +1,6 @@
 """What an index knows about a file: the same that the other verbs say of it, within bounds, and of whatever file."""
 import base64
+import contextlib
 import json
 import os
 import shutil
@@ -10,7 +11,7 @@ import unittest
 
 from command import KTFILES, MEDIA, CommandTest, chunk, wave
 
-RIFF_SIZE = 8
+TRACES = shutil.which("strace") and subprocess.run(["strace", "-o", "/dev/null", "true"], capture_output=True).returncode == 0
 
 
 def id3(**frames):
@@ -53,9 +54,24 @@ class IndexRecords(CommandTest):
         """By name, the records of the files below the folder "lib", which are all read."""
         for index in self.folder.glob("index.db*"):
             index.unlink()
+        self.update(*options, status=status)
+        return self.known()
+
+    def update(self, *options, status=0):
         self.run_command("index", "--quiet", "--db", "index.db", *options, "lib", status=status)
+
+    def known(self):
         found = [json.loads(line) for line in self.lines("index", "export", "--db", "index.db")]
         return {os.path.basename(each["path"]): each for each in found if "root" not in each}
+
+    @contextlib.contextmanager
+    def holding(self, name):
+        """Keeps readers away from a file."""
+        with subprocess.Popen([KTFILES, "lock", "--write", name, "--", "sh", "-c", "echo held; cat"], cwd=self.folder,
+                              stdin=subprocess.PIPE, stdout=subprocess.PIPE) as holder:
+            self.assertEqual(holder.stdout.readline(), b"held\n")
+            yield
+            holder.stdin.close()
 
     def make(self, *commands):
         for command in commands:
@@ -292,13 +308,64 @@ class IndexRecords(CommandTest):
 
     def test_a_file_that_another_program_holds_is_not_waited_for_long(self):
         shutil.copy(MEDIA / "tone-16.aiff", self.folder / "lib")
-        with subprocess.Popen([KTFILES, "lock", "--write", "lib/tone-16.aiff", "--", "sh", "-c", "echo held; cat"], cwd=self.folder,
-                              stdin=subprocess.PIPE, stdout=subprocess.PIPE) as holder:
-            self.assertEqual(holder.stdout.readline(), b"held\n")
-            record = self.records(status=None)["tone-16.aiff"]
-            holder.stdin.close()
+        with self.holding("lib/tone-16.aiff"):
+            record = self.records(status=1)["tone-16.aiff"]
         self.assertEqual((record["state"], record["inode"], [problem["kind"] for problem in record["problems"]]), ("unreadable", 0, ["inUse"]))
-        self.assertEqual(self.records()["tone-16.aiff"]["state"], "whole")
+        self.update()
+        known = self.known()["tone-16.aiff"]
+        self.assertEqual(known["state"], "whole")
+        path = self.folder / "lib/tone-16.aiff"
+        path.write_bytes(path.read_bytes() + bytes(100))
+        with self.holding("lib/tone-16.aiff"):
+            self.update(status=1)
+        self.assertEqual(self.known()["tone-16.aiff"], known, "what was known before stays")
+        self.update()
+        self.assertEqual(self.known()["tone-16.aiff"]["state"], "damaged")
+
+    @unittest.skipUnless(TRACES, "strace cannot trace here")
+    def test_a_read_that_fails_is_never_taken_for_an_end(self):
+        self.write("loop.wav", wave(chunk(b"keep", bytes(9000)), acid(flags=2, root=60, beats=8, tempo=120), chunk(b"more", bytes(9000)),
+                                    info(INAM=b"title"), frames=192000))
+        shutil.copy(MEDIA / "bassline.aiff", self.folder)
+        self.encoded("tone.mp3", "-metadata", "title=T")
+        for name in ("loop.wav", "bassline.aiff", "tone.mp3"):
+            good = self.failing(name, "pread64", 0)
+            self.assertEqual(good["state"], "whole", name)
+            failed = 0
+            for number in range(1, 50):
+                record = self.failing(name, "pread64", number)
+                if record is None:
+                    break
+                if record["state"] == "whole":
+                    self.assertEqual(record, good, (name, number))
+                else:
+                    failed += 1
+                    self.assertTrue(any(problem["text"] for problem in record["problems"]), (name, number, record))
+            self.assertGreater(failed, 1, name)
+
+    def failing(self, name, call, number):
+        """The record that is made when the call of that number on the file fails; 0: none. None: there are not so many."""
+        log = self.folder / "log"
+        inject = ["-e", f"inject={call}:error=EIO:when={number}"] if number else []
+        trace = ["strace", "-f", "-o", log, "-P", name, "-e", f"trace={call}", *inject]
+        result = subprocess.run([*trace, KTFILES, "index", "--records", "--jsonl", "-j1", name], cwd=self.folder, capture_output=True, timeout=60)
+        if number and b"INJECTED" not in log.read_bytes():
+            return None
+        record, = (each for each in map(json.loads, result.stdout.splitlines()) if "root" not in each)
+        record.pop("indexed", None)
+        return record
+
+    def test_tempo_and_key_of_other_formats(self):
+        self.make("sox -n -r 44100 -b 16 -c 2 s.wav synth 4411s sine 300", "flac -s -T BPM=99.5 -T KEY=Gm s.wav -o bpm.flac",
+                  "flac -s -T TEMPO=98 -T INITIALKEY=4A s.wav -o tempo.flac", "opusenc --quiet --comment BPM=97 --comment initialkey=Bb s.wav o.opus",
+                  "oggenc -Q -c bpm=96 -c key=Ebm s.wav -o o.ogg", "wavpack -q -w BPM=95 -w KEY=Abm s.wav", "ffmpeg -i s.wav m.m4a",
+                  "exiftool -q -overwrite_original -ItemList:BeatsPerMinute=94 m.m4a", "ffmpeg -i s.wav -metadata TBPM=93 -metadata TKEY=Dbm l.mp3")
+        expected = {"bpm.flac": (99.5, "vorbis.BPM", "G minor"), "tempo.flac": (98, "vorbis.TEMPO", "F minor"), "o.opus": (97, "vorbis.BPM", "Bb major"),
+                    "o.ogg": (96, "vorbis.BPM", "D# minor"), "s.wv": (95, "ape.BPM", "Ab minor"), "m.m4a": (94, "mp4.tmpo", None),
+                    "l.mp3": (93, "id3v2.TBPM", "Db minor"), "s.wav": (None, None, None)}
+        records = self.records("--no-overview")
+        for name, values in expected.items():
+            self.assertEqual((records[name].get("tempo"), records[name].get("tempoSource"), records[name].get("key")), values, name)
 
 
 if __name__ == "__main__":

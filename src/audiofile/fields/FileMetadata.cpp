@@ -165,6 +165,19 @@ std::optional<HeldMetadata> holdChunks(CAudioFileIO& file, const MetaGroups& gro
     return held;
 }
 
+std::optional<FileMetadata> readFields(CAudioFileIO& file, const CFileRef& ref, const MetaGroups& groups,
+                                       platform::Error* error)
+{
+    std::optional<FileMetadata> metadata;
+    if (!file.HasChunks())
+        metadata = readTags(file, ref, error);
+    else if (const auto held = holdChunks(file, groups, error))
+        metadata = FileMetadata{held->container, MetadataFieldsOf(*held, groups)};
+    if (metadata && !groups.empty())
+        std::erase_if(metadata->fields, [&](const MetaField& field) { return !isWanted(field.group, groups); });
+    return metadata;
+}
+
 /// Reads headers and neighbouring chunks at once, into a block that a thread reuses for file after file.
 void readAhead(CAudioFileIO& file)
 {
@@ -206,14 +219,15 @@ std::optional<FileMetadata> ReadMetadataFields(const CFileRef& ref, const MetaGr
     readAhead(file);
     if (!succeeded(file.OpenForChunks(ref, 0), error))
         return std::nullopt;
-    std::optional<FileMetadata> metadata;
-    if (!file.HasChunks())
-        metadata = readTags(file, ref, error);
-    else if (const auto held = holdChunks(file, groups, error))
-        metadata = FileMetadata{held->container, MetadataFieldsOf(*held, groups)};
-    if (metadata && !groups.empty())
-        std::erase_if(metadata->fields, [&](const MetaField& field) { return !isWanted(field.group, groups); });
-    return metadata;
+    return readFields(file, ref, groups, error);
+}
+
+std::optional<FileMetadata> ReadMetadataFieldsOfOpenFile(CAudioFileIO& file, const MetaGroups& groups,
+                                                         platform::Error* error)
+{
+    if (!succeeded(file.IsOpen() ? kStatusOK : kStatusNotOpen, error))
+        return std::nullopt;
+    return readFields(file, file, groups, error);
 }
 
 std::vector<std::string> MetadataGroupNames()

@@ -10,6 +10,8 @@
 #include <string>
 #include <vector>
 
+class CAudioFileIO;
+
 /// Codes of the domain "metadata". Other errors are of the domain "status".
 enum class MetadataError : std::int64_t {
     noAudio = 1,   // the file has no sound, or is damaged; the description says what it lacks
@@ -34,6 +36,11 @@ using MetaGroups = std::vector<std::string>;
 /// groups that are not wanted are not read. Null, with `error`, on failure.
 KT_EXPORT std::optional<FileMetadata> ReadMetadataFields(const CFileRef& file, const MetaGroups& groups = {},
                                                          platform::Error* error = nullptr);
+
+/// The same of a file that is open, through its read cache. A file without chunks must have been described at opening
+/// (CAudioFileIO::Open), or is opened once more where it has no tags.
+KT_EXPORT std::optional<FileMetadata> ReadMetadataFieldsOfOpenFile(CAudioFileIO& file, const MetaGroups& groups = {},
+                                                                   platform::Error* error = nullptr);
 
 /// The groups of all containers, each once, in small letters.
 KT_EXPORT std::vector<std::string> MetadataGroupNames();

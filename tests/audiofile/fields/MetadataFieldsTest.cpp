@@ -1,5 +1,6 @@
 // Fields of files as hosts read them, and the errors that they are told of; what each chunk says is tested by the
 // command.
+#include "audiofile/CAudioFileIO.h"
 #include "audiofile/fields/FileMetadata.h"
 #include "platform/core/Status.h"
 #include "support/ContainerBuilder.h"
@@ -49,6 +50,14 @@ TEST_F(MetadataFields, AreThoseOfTheGroupsThatAreWanted)
         << "which was Latin-1";
     EXPECT_EQ(valueOf(*all, "mine"), "6162");
     EXPECT_EQ(all->fields.front().chunk, fourCC("LIST"));
+
+    CAudioFileIO file;
+    EXPECT_FALSE(ReadMetadataFieldsOfOpenFile(file, {}, &error)) << "not open";
+    ASSERT_EQ(file.Open(CFileRef(path.c_str(), false), 0), kStatusOK);
+    const auto ofOpen = ReadMetadataFieldsOfOpenFile(file, {"mine"}, &error);
+    ASSERT_TRUE(ofOpen) << error.description;
+    EXPECT_EQ(valueOf(*ofOpen, "mine"), "6162");
+    EXPECT_EQ(ofOpen->fields.size(), 1u);
 
     const auto some = read(path, {"INFO"});
     ASSERT_TRUE(some);

@@ -21,10 +21,12 @@
 
 namespace {
 
-constexpr double kLongestWait = 2;           // in seconds, for other programs
-constexpr int kMostReadings = 3;             // of a file that changes while it is read
-constexpr std::size_t kMostProblems = 1000;  // of a file
-constexpr std::size_t kMostOfProblem = 1024; // bytes of a text
+constexpr const char* kUnreadable = "unreadable"; // a state, and the kind of a problem
+constexpr const char* kInUse = "inUse";           // the kind of a problem
+constexpr double kLongestWait = 2;                // in seconds, for other programs
+constexpr int kMostReadings = 3;                  // of a file that changes while it is read
+constexpr std::size_t kMostProblems = 1000;       // of a file
+constexpr std::size_t kMostOfProblem = 1024;      // bytes of a text
 
 std::int64_t inNanoseconds(const timespec& time)
 {
@@ -44,7 +46,10 @@ std::optional<SeenStamp> stampOf(const std::string& path)
 // Reads one file once.
 class LibraryFileReading {
 public:
-    LibraryFileReading(const FilePlace& place, const LibraryReading& wanted) : path_(place.path()), wanted_(wanted)
+    LibraryFileReading(const FilePlace& place, std::int64_t size, const LibraryReading& wanted)
+        : path_(place.path()),
+          size_(size),
+          wanted_(wanted)
     {
         record_.place = place;
     }
@@ -57,11 +62,11 @@ public:
         } catch (const OtherKind& other) {
             if (!other.isAudio() && !isCalledAudio(path_))
                 return std::nullopt;
-            fail("unreadable", other.what());
+            fail(kUnreadable, other.what());
         } catch (const Failure& failure) {
             if (!isOpen_ && !isCalledAudio(path_))
                 return std::nullopt;
-            fail("unreadable", failure.what());
+            fail(kUnreadable, failure.what());
         }
         return std::move(record_);
     }
@@ -76,18 +81,36 @@ private:
                 access = accessForReading(path_, {.timeoutSeconds = kLongestWait, .quiet = true});
             } catch (const Failure& failure) {
                 isInUse_ = true;
-                fail("inUse", failure.what());
+                fail(kInUse, failure.what());
                 return;
             }
         }
         CAudioFileIO file;
-        requireOK(file.Open(referenceTo(path_), 0));
+        readAhead(file);
+        const platform::URLRef location = fileLocation(path_);
+        if (const std::int32_t status = file.Open(CFileRef(location), 0); status != kStatusOK) {
+            requireRegularFile(path_); // knows best what is wrong with it
+            requireOK(status);
+        }
         isOpen_ = true;
         describeOpened(file, path_);
         addSound(record_, file.Info());
         addProblems(file);
-        addTags(file);
+        addTags(file, location);
         addSamples(file);
+    }
+
+    /// A small file whose samples are wanted too is read at once, others by their headers, into blocks that a thread
+    /// uses again for file after file.
+    void readAhead(CAudioFileIO& file) const
+    {
+        constexpr std::size_t kWhole = 256 * 1024, kHeaders = 4096;
+        const bool isWhole = (wanted_.overview || wanted_.hash) && size_ <= std::int64_t{kWhole};
+        thread_local std::shared_ptr<KTMem> whole, headers;
+        std::shared_ptr<KTMem>& block = isWhole ? whole : headers;
+        if (!block)
+            block = std::make_shared<KTMem>(isWhole ? kWhole : kHeaders);
+        file.SetCache(block);
     }
 
     void addProblems(CAudioFileIO& file)
@@ -100,17 +123,38 @@ private:
         record_.state = record_.problems.empty() && file.Info().IsWhole() ? "whole" : "damaged";
     }
 
-    void addTags(CAudioFileIO& file)
+    void addTags(CAudioFileIO& file, const platform::URLRef& location)
     {
-        if (file.HasChunks())
-            if (auto tags = readLoopTags(fileLocation(path_)))
+        platform::Error error;
+        if (file.HasChunks()) {
+            if (auto tags = readLoopTags(location, &error))
                 addLoopTags(record_, std::move(*tags));
+            else
+                noteFailure(error);
+        }
         if (record_.kind.empty())
             record_.kind = "recording";
-        if (const auto metadata = ReadMetadataFields(referenceTo(path_))) {
+        if (const auto metadata = ReadMetadataFieldsOfOpenFile(file, {}, &error)) {
             addFieldTexts(record_, metadata->fields);
             record_.fields = fieldsJson(metadata->fields);
+        } else {
+            noteFailure(error);
         }
+    }
+
+    /// What was not read for a reason that is no property of a kind of file, unless the reason is known already.
+    void noteFailure(const platform::Error& error)
+    {
+        const bool isBadHeader =
+            error.domain == kMetadataErrorDomain && error.code == static_cast<std::int64_t>(MetadataError::badHeader);
+        if ((error.domain == platform::ErrorDomain::status || isBadHeader) && record_.problems.empty())
+            addDamage(error.description);
+    }
+
+    void addDamage(const std::string& text)
+    {
+        record_.state = "damaged";
+        addProblem(kUnreadable, text);
     }
 
     /// A file whose sound cannot be read has neither waveform nor hash; of linear PCM, that is a problem.
@@ -123,8 +167,7 @@ private:
         record_.soundHash = std::move(pass.hash);
         if (pass.status == kStatusOK || file.Info().compressed)
             return;
-        record_.state = "damaged";
-        addProblem("unreadable", StatusText(pass.status));
+        addDamage(StatusText(pass.status));
     }
 
     void addProblem(const char* kind, const std::string& text)
@@ -135,11 +178,12 @@ private:
 
     void fail(const char* kind, const std::string& text)
     {
-        record_.state = "unreadable";
+        record_.state = kUnreadable;
         addProblem(kind, text);
     }
 
     const std::string path_;
+    const std::int64_t size_;
     const LibraryReading wanted_;
     bool isOpen_ = false, isInUse_ = false;
     LibraryRecord record_;
@@ -152,7 +196,7 @@ std::optional<LibraryRecord> readLibraryRecord(const FilePlace& place, const See
 {
     SeenStamp before = stamp;
     for (int reading = 1;; ++reading) {
-        LibraryFileReading file(place, wanted);
+        LibraryFileReading file(place, before.size, wanted);
         auto record = file.read();
         const auto after = stampOf(place.path());
         if (!record || !after)
@@ -166,4 +210,9 @@ std::optional<LibraryRecord> readLibraryRecord(const FilePlace& place, const See
             return record;
         before = *after;
     }
+}
+
+bool isInUse(const LibraryRecord& record)
+{
+    return record.state == kUnreadable && !record.problems.empty() && record.problems.front().kind == kInUse;
 }

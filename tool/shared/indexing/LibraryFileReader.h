@@ -21,3 +21,6 @@ struct LibraryReading {
 /// no file has, with `inode` and `changed` 0, so that it is read again. Throws std::bad_alloc, nothing else.
 std::optional<LibraryRecord> readLibraryRecord(const FilePlace& place, const SeenStamp& stamp,
                                                const LibraryReading& wanted);
+
+/// Whether the record says no more than that another program holds the file: what an index knew before is worth more.
+bool isInUse(const LibraryRecord& record);

@@ -12,9 +12,10 @@ namespace {
 
 constexpr std::size_t kMostOfTags = 1 << 18; // bytes of the JSON object
 
-std::string tagSource(const LoopTags& tags, const char* name)
+using TagSources = std::map<std::string, std::string, std::less<>>;
+
+std::string tagSource(const TagSources& sources, std::string_view name)
 {
-    const auto sources = loopTagSources(tags);
     const auto found = sources.find(name);
     return found == sources.end() ? "" : boundedLine(found->second, kMostOfLine);
 }
@@ -29,7 +30,7 @@ std::string joinedDescriptors(const LoopTags& tags)
     return boundedLine(joined, kMostOfLine);
 }
 
-void addKey(LibraryRecord& record, const LoopTags& tags)
+void addKey(LibraryRecord& record, const LoopTags& tags, const TagSources& sources)
 {
     constexpr std::int64_t kNotes = 12, kMostNote = 127;
     const std::int64_t note = tags.number(VireoLoopCombinedTagsChunkDataMidiRootNoteKey);
@@ -40,7 +41,7 @@ void addKey(LibraryRecord& record, const LoopTags& tags)
         return;
     record.keyNote = note % kNotes;
     record.key = keyWords(tags);
-    record.keySource = tagSource(tags, "midiRootNote");
+    record.keySource = tagSource(sources, "midiRootNote");
 }
 
 std::string objectOf(const LoopTags& tags)
@@ -69,16 +70,17 @@ void shortenTags(LoopTags& tags)
 void addLoopTags(LibraryRecord& record, LoopTags tags)
 {
     constexpr std::int64_t kNotALoop = 2;
+    const TagSources sources = loopTagSources(tags);
     if (tags.number(VireoLoopCombinedTagsChunkDataFileTypeKey) == kNotALoop)
         record.kind = "one-shot";
     else if (tags.isLoop())
         record.kind = "loop";
     if (const double tempo = tags.tempo(); tempo > 0) {
         record.tempo = tempo;
-        record.tempoSource = tagSource(tags, "tempo");
+        record.tempoSource = tagSource(sources, "tempo");
     }
     record.beatCount = positive(tags.number(VireoLoopCombinedTagsChunkDataBeatCountKey));
-    addKey(record, tags);
+    addKey(record, tags, sources);
     record.signature = loopSignature(tags);
     record.category = boundedLine(tags.text(VireoLoopCombinedTagsChunkDataInstrumentTypeKey), kMostOfLine);
     record.subCategory = boundedLine(tags.text(VireoLoopCombinedTagsChunkDataInstrumentSubTypeKey), kMostOfLine);

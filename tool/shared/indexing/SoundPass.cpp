@@ -19,7 +19,7 @@ public:
         : file_(file),
           info_(file.Info()),
           hashesBytes_(info_.dataOffset > 0 && info_.dataSize > 0),
-          sparse_(path)
+          sparse_(path, info_.fileLength)
     {
         canBeRead_ = file.OpenDecoder() == kStatusOK && (info_.compressed || info_.IsLinearPCM()) && info_.frames > 0 &&
                      info_.channels > 0 && info_.channels <= MDOverview::kMostChannels;

@@ -7,18 +7,17 @@
 namespace {
 
 /// Whether much of the file is not on the disk.
-bool hasHoles(const std::string& path)
+bool hasHoles(const std::string& path, std::int64_t size)
 {
     constexpr std::int64_t kBlock = 512, kWorthIt = 1 << 26; // what is smaller is read quickly
     struct stat status = {};
-    return ::stat(path.c_str(), &status) == 0 && status.st_size > kWorthIt &&
-           status.st_blocks < status.st_size / kBlock / 2;
+    return size > kWorthIt && ::stat(path.c_str(), &status) == 0 && status.st_blocks < status.st_size / kBlock / 2;
 }
 
 } // namespace
 
-SparseFile::SparseFile(const std::string& path)
-    : file_(hasHoles(path) ? ::open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK | O_NOCTTY) : -1)
+SparseFile::SparseFile(const std::string& path, std::int64_t size)
+    : file_(hasHoles(path, size) ? ::open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK | O_NOCTTY) : -1)
 {
 }
 

@@ -9,7 +9,8 @@
 /// Knows the holes of one file. Owns a descriptor of its own if the file has any to speak of.
 class SparseFile {
 public:
-    explicit SparseFile(const std::string& path);
+    /// `size` is that of the file, in bytes.
+    SparseFile(const std::string& path, std::int64_t size);
 
     /// Where the hole ends that contains so many bytes from `offset` on; `offset` if there is none.
     std::int64_t endOfHole(std::int64_t offset, std::int64_t bytes);

@@ -91,9 +91,11 @@ void UpdateBatch::write(const FileReading& reading)
         changes_.removed += job.isKnown ? 1 : 0;
         return;
     }
+    changes_.unreadable += reading.record->state == "unreadable" ? 1 : 0;
+    if (job.isKnown && isInUse(*reading.record))
+        return; // with its old stamp, so that it is read next time
     writer_.put(*reading.record, folder);
     ++(job.isKnown ? changes_.changed : changes_.added);
-    changes_.unreadable += reading.record->state == "unreadable" ? 1 : 0;
     changes_.loops += reading.record->kind == "loop" ? 1 : 0;
 }
 

@@ -65,7 +65,8 @@ std::optional<FileMetadata> readTags(CAudioFileIO& file, const CFileRef& ref, pl
     platform::Error why;
     const std::int32_t status =
         platform::readEmbeddedTags(bytes, static_cast<std::uint64_t>(file.GetEOF()), tags, &why);
-    if (tags.empty() && !isAudio(ref, error))
+    const bool isDescribed = file.InfoStatus() == kStatusOK && file.Info().fileType != 0;
+    if (tags.empty() && !isDescribed && !isAudio(ref, error))
         return std::nullopt;
     if (status != kStatusOK) {
         platform::fail(error, kMetadataErrorDomain, static_cast<std::int64_t>(MetadataError::badTag),

@@ -157,7 +157,7 @@ private:
         addProblem(kUnreadable, text);
     }
 
-    /// A file whose sound cannot be read has neither waveform nor hash; of linear PCM, that is a problem.
+    /// A file whose sound cannot be read has neither waveform nor hash.
     void addSamples(CAudioFileIO& file)
     {
         if (!wanted_.overview && !wanted_.hash)
@@ -165,9 +165,8 @@ private:
         SoundPass pass = passThroughSound(file, path_, {.waveform = wanted_.overview, .hash = wanted_.hash});
         record_.overview = std::move(pass.waveform);
         record_.soundHash = std::move(pass.hash);
-        if (pass.status == kStatusOK || file.Info().compressed)
-            return;
-        addDamage(StatusText(pass.status));
+        if (pass.status != kStatusOK)
+            addDamage(StatusText(pass.status));
     }
 
     void addProblem(const char* kind, const std::string& text)

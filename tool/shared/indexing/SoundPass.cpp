@@ -1,6 +1,7 @@
 #include "tool/shared/indexing/SoundPass.h"
 
 #include "loops/overview/MDOverview.h"
+#include "media/containers/AudioHandle.h"
 #include "platform/Digest.h"
 #include "platform/core/HexText.h"
 #include "tool/shared/indexing/SparseFile.h"
@@ -21,7 +22,9 @@ public:
           hashesBytes_(info_.dataOffset > 0 && info_.dataSize > 0),
           sparse_(path, info_.fileLength)
     {
-        canBeRead_ = file.OpenDecoder() == kStatusOK && (info_.compressed || info_.IsLinearPCM()) && info_.frames > 0 &&
+        const std::int32_t status = file.OpenDecoder();
+        decoding_ = status == platform::AudioHandle::kFormatNotSupported ? std::int32_t{kStatusOK} : status;
+        canBeRead_ = status == kStatusOK && (info_.compressed || info_.IsLinearPCM()) && info_.frames > 0 &&
                      info_.channels > 0 && info_.channels <= MDOverview::kMostChannels;
         if (wanted.waveform && canBeRead_)
             waveform_.emplace();
@@ -32,6 +35,9 @@ public:
     SoundPass run()
     {
         SoundPass pass;
+        pass.status = decoding_;
+        if (pass.status != kStatusOK)
+            return pass;
         const bool isOnePass = !info_.compressed && canBeRead_; // of the bytes, for both
         if (waveform_ || (hash_ && !hashesBytes_) || (hash_ && isOnePass))
             pass.status = passFrames();
@@ -167,6 +173,7 @@ private:
     const bool hashesBytes_; // they lie in one piece
     SparseFile sparse_;
     std::int64_t endOfHole_ = 0;
+    std::int32_t decoding_ = kStatusOK; // why nothing can be decoded, unless nothing here decodes it
     bool canBeRead_ = false;
     bool isAtEnd_ = false;
     std::int64_t framesPassed_ = 0;

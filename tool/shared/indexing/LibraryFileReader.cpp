@@ -16,6 +16,7 @@
 #include "tool/shared/input/InputFile.h"
 #include "tool/shared/output/Failure.h"
 
+#include <chrono>
 #include <ctime>
 #include <sys/stat.h>
 
@@ -24,6 +25,7 @@ namespace {
 constexpr const char* kUnreadable = "unreadable"; // a state, and the kind of a problem
 constexpr const char* kInUse = "inUse";           // the kind of a problem
 constexpr double kLongestWait = 2;                // in seconds, for other programs
+constexpr std::chrono::seconds kQuick{1};         // what took longer is not read again at once
 constexpr int kMostReadings = 3;                  // of a file that changes while it is read
 constexpr std::size_t kMostProblems = 1000;       // of a file
 constexpr std::size_t kMostOfProblem = 1024;      // bytes of a text
@@ -70,7 +72,8 @@ public:
         }
         return std::move(record_);
     }
-    bool isInUse() const { return isInUse_; }
+    /// Whether it was read to its end, as far as that can be.
+    bool isComplete() const { return isComplete_; }
 
 private:
     void readAll()
@@ -80,7 +83,7 @@ private:
             try {
                 access = accessForReading(path_, {.timeoutSeconds = kLongestWait, .quiet = true});
             } catch (const Failure& failure) {
-                isInUse_ = true;
+                isComplete_ = false;
                 fail(kInUse, failure.what());
                 return;
             }
@@ -162,10 +165,11 @@ private:
     {
         if (!wanted_.overview && !wanted_.hash)
             return;
-        SoundPass pass = passThroughSound(file, path_, {.waveform = wanted_.overview, .hash = wanted_.hash});
+        SoundPass pass = passThroughSound(file, path_, {wanted_.overview, wanted_.hash, wanted_.goesOn});
         record_.overview = std::move(pass.waveform);
         record_.soundHash = std::move(pass.hash);
-        if (pass.status != kStatusOK)
+        isComplete_ = pass.status != kStatusUserCancelled;
+        if (isComplete_ && pass.status != kStatusOK)
             addDamage(StatusText(pass.status));
     }
 
@@ -183,8 +187,8 @@ private:
 
     const std::string path_;
     const std::int64_t size_;
-    const LibraryReading wanted_;
-    bool isOpen_ = false, isInUse_ = false;
+    const LibraryReading& wanted_;
+    bool isOpen_ = false, isComplete_ = true;
     LibraryRecord record_;
 };
 
@@ -193,6 +197,7 @@ private:
 std::optional<LibraryRecord> readLibraryRecord(const FilePlace& place, const SeenStamp& stamp,
                                                const LibraryReading& wanted)
 {
+    const auto begin = std::chrono::steady_clock::now();
     SeenStamp before = stamp;
     for (int reading = 1;; ++reading) {
         LibraryFileReading file(place, before.size, wanted);
@@ -202,11 +207,13 @@ std::optional<LibraryRecord> readLibraryRecord(const FilePlace& place, const See
             return std::nullopt;
         record->stamp = *after;
         record->indexed = std::time(nullptr);
-        const bool isSettled = *after == before && !file.isInUse();
-        if (!isSettled && (reading == kMostReadings || file.isInUse()))
-            record->stamp.changed = record->stamp.inode = 0;
-        if (isSettled || record->stamp.inode == 0)
+        if (*after == before && file.isComplete())
             return record;
+        const bool isLast = reading == kMostReadings || std::chrono::steady_clock::now() - begin > kQuick;
+        if (isLast || !file.isComplete()) {
+            record->stamp.changed = record->stamp.inode = 0;
+            return record;
+        }
         before = *after;
     }
 }

@@ -59,6 +59,7 @@ ReadingPool::ReadingPool(UpdateInbox& inbox, const LibraryReading& reading, unsi
       measured_(std::chrono::steady_clock::now()),
       processorSeconds_(processorSeconds())
 {
+    reading_.goesOn = [this] { return !isEnding_; };
     threads_.reserve(std::max<std::size_t>(threadsFor(threads), kMostWaiting));
 }
 
@@ -114,7 +115,7 @@ void ReadingPool::adjust()
 void ReadingPool::stop()
 {
     const std::lock_guard lock(mutex_);
-    isStopped_ = true;
+    isStopped_ = isEnding_ = true;
     jobs_.clear();
     ready_.notify_all();
 }

@@ -26,7 +26,7 @@ public:
     void took(std::size_t readings) { pending_ -= readings; }
     /// Call now and then: starts further threads when those there are wait most of the time.
     void adjust();
-    /// Forgets the files that nobody has begun.
+    /// Forgets the files that nobody has begun, and ends the reading of the others early.
     void stop();
 
 private:
@@ -36,6 +36,7 @@ private:
     static constexpr std::size_t kMostWaiting = 32; // threads, unless the user asks for more
 
     UpdateInbox& inbox_;
+    std::atomic<bool> isEnding_ = false;
     LibraryReading reading_;
     unsigned asked_;
     std::size_t pending_ = 0; // of the giver's

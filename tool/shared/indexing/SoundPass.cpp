@@ -20,7 +20,8 @@ public:
         : file_(file),
           info_(file.Info()),
           hashesBytes_(info_.dataOffset > 0 && info_.dataSize > 0),
-          sparse_(path, info_.fileLength)
+          sparse_(path, info_.fileLength),
+          goesOn_(wanted.goesOn)
     {
         const std::int32_t status = file.OpenDecoder();
         decoding_ = status == platform::AudioHandle::kFormatNotSupported ? std::int32_t{kStatusOK} : status;
@@ -75,6 +76,8 @@ private:
     /// At most kFramesPerBlock frames.
     std::int32_t passBlock(std::int64_t begin, std::int64_t frames, std::int64_t most)
     {
+        if (goesOn_ && !goesOn_())
+            return kStatusUserCancelled;
         if (isInHole(begin, frames)) {
             addSilence(frames);
             return kStatusOK;
@@ -158,6 +161,8 @@ private:
     {
         piece_.resize(static_cast<std::size_t>(kPieceSize));
         while (done < info_.dataSize) {
+            if (goesOn_ && !goesOn_())
+                return kStatusUserCancelled;
             const std::int64_t count = std::min<std::int64_t>(std::ssize(piece_), info_.dataSize - done);
             if (const std::int32_t status = file_.Read(piece_.data(), info_.dataOffset + done, count, nullptr);
                 status != kStatusOK)
@@ -172,6 +177,7 @@ private:
     const AudioFileInfo& info_;
     const bool hashesBytes_; // they lie in one piece
     SparseFile sparse_;
+    const std::function<bool()>& goesOn_;
     std::int64_t endOfHole_ = 0;
     std::int32_t decoding_ = kStatusOK; // why nothing can be decoded, unless nothing here decodes it
     bool canBeRead_ = false;

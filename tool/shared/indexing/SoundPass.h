@@ -5,11 +5,13 @@
 #include "tool/shared/library/LibraryRecord.h"
 
 #include <cstdint>
+#include <functional>
 #include <optional>
 #include <string>
 
 struct SoundPassWish {
     bool waveform = false, hash = false;
+    std::function<bool()> goesOn = {}; // asked now and then; its no ends the pass with kStatusUserCancelled
 };
 
 struct SoundPass {

@@ -14,6 +14,13 @@ void addKeyOnce(std::vector<KeyChoice>& keys, KeyChoice key)
 
 } // namespace
 
+LibraryQuery::Order LibraryQuery::settledOrder() const
+{
+    if (order)
+        return *order;
+    return takesDuplicates ? Order::sound : terms.empty() ? Order::path : Order::relevance;
+}
+
 std::vector<NumberRange> wantedTempos(const LibraryQuery& query)
 {
     std::vector<NumberRange> tempos = query.tempos;

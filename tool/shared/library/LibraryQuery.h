@@ -32,7 +32,8 @@ struct LibraryQuery {
         std::string path;  // absolute, links resolved, with a slash at the end
         std::string typed; // as it was named, with a slash at the end; results are named below it
     };
-    enum class Order { relevance, path, name, tempo, key, duration, size, modified, category, rate };
+    /// `sound` puts the same sounds together, and is for duplicates only.
+    enum class Order { relevance, path, name, tempo, key, duration, size, modified, category, rate, sound };
 
     std::vector<Scope> scopes;      // one of them holds the file
     std::vector<std::string> terms; // each begins a word of the file, or is several words in a row
@@ -61,7 +62,7 @@ struct LibraryQuery {
 
     std::vector<std::string> words; // those of the command line, until `settleWords` tells scopes from terms
 
-    Order settledOrder() const { return order.value_or(terms.empty() ? Order::path : Order::relevance); }
+    Order settledOrder() const;
 };
 
 /// The tempos with those half and twice as fast if they are wanted.

@@ -63,7 +63,8 @@ std::string problemOfChoice(std::span<const Choice> choices, const std::string& 
     std::vector<std::string_view> words;
     for (const Choice& choice : choices)
         words.push_back(choice.word);
-    return fmt::format("{} is no {}{}{}", shownValue(text), what, didYouMean(text, words), examples);
+    const std::string nearest = didYouMean(text, words);
+    return fmt::format("{} is no {}{}{} {}", shownValue(text), what, nearest, nearest.empty() ? ";" : "", examples);
 }
 
 Argument addChoice(Verb& verb, const std::string& name, const std::string& label, std::span<const Choice> choices,
@@ -183,7 +184,9 @@ std::string problemOfOrder(const std::string& text)
     std::vector<std::string_view> words;
     for (const auto& order : orderWords())
         words.push_back(order.first);
-    return fmt::format("{} is no order{}: {}", shownValue(text), didYouMean(text, words), fmt::join(words, ", "));
+    const std::string nearest = didYouMean(text, words);
+    return fmt::format("{} is no order{}{} {} are", shownValue(text), nearest, nearest.empty() ? ";" : "",
+                       fmt::join(words, ", "));
 }
 
 void addMusicOptions(Verb& verb, LibraryQuery& query)
@@ -198,7 +201,7 @@ void addMusicOptions(Verb& verb, LibraryQuery& query)
     verb.addFlag("--related", query.takesRelated, "Relative and parallel keys too, and tempos half and twice as fast");
     addChoice(
         verb, "--kind", "KIND", kindChoices(), [&](const Choice& choice) { query.kind = choice.meant.front(); },
-        "loop, one-shot or recording", "kind", ": loop, one-shot or recording is one");
+        "loop, one-shot or recording", "kind", "loop, one-shot or recording is one");
     verb.addText("--category", query.category, "Of that instrument category or sub-category").label("NAME");
     verb.addText("--genre", query.genre, "Of that genre").label("NAME");
     verb.addText("--artist", query.artist, "By that artist").label("NAME");
@@ -230,7 +233,7 @@ void addSoundOptions(Verb& verb, LibraryQuery& query)
         verb, "--format", "FORMAT", formatChoices(),
         [&](const Choice& choice) { appendAll(query.containers, choice.meant); },
         "wav, aiff, caf, mp3, m4a, flac, ogg, and others", "format",
-        ": wav, aiff, aifc, caf, mp3, aac, m4a, flac, ogg, wma, wavpack, w64 are some");
+        "wav, aiff, aifc, caf, mp3, aac, m4a, flac, ogg, wma, wavpack, w64 are some");
     addChoice(
         verb, "--problem", "KIND", problemChoices(),
         [&](const Choice& choice) {
@@ -238,7 +241,7 @@ void addSoundOptions(Verb& verb, LibraryQuery& query)
             appendAll(query.problems, choice.meant);
         },
         "With that problem: truncated, unreadable, a kind that info --check names, or any", "problem",
-        ": any, truncated, unreadable, or a kind that info --check names, such as soundIsCut");
+        "any, truncated, unreadable, or a kind that info --check names, such as soundIsCut, is one");
 }
 
 void addOrderOptions(Verb& verb, LibraryQuery& query)

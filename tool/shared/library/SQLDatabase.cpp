@@ -156,6 +156,15 @@ SQLStatement& SQLStatement::bindNull(int parameter)
     return *this;
 }
 
+SQLStatement& SQLStatement::bindTest(int parameter, const SQLTest& test)
+{
+    // SQLite hands the pointer back as it is, to a function that reads only.
+    void* const pointer = const_cast<SQLTest*>(&test);
+    requireBound(statement_.get(),
+                 sqlite3_bind_pointer(statement_.get(), parameter, pointer, kSQLTestPointer, nullptr));
+    return *this;
+}
+
 bool SQLStatement::step()
 {
     const int code = sqlite3_step(statement_.get());
@@ -185,6 +194,16 @@ void SQLStatement::reset()
 bool SQLStatement::isNull(int column) const
 {
     return sqlite3_column_type(statement_.get(), column) == SQLITE_NULL;
+}
+
+bool SQLStatement::isText(int column) const
+{
+    return sqlite3_column_type(statement_.get(), column) == SQLITE_TEXT;
+}
+
+bool SQLStatement::isReal(int column) const
+{
+    return sqlite3_column_type(statement_.get(), column) == SQLITE_FLOAT;
 }
 
 std::int64_t SQLStatement::number(int column) const

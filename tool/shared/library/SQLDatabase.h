@@ -1,6 +1,8 @@
 // A connection to an SQLite database, and statements on it.
 #pragma once
 
+#include "tool/shared/library/SQLTest.h"
+
 #include <cstdint>
 #include <memory>
 #include <optional>
@@ -40,6 +42,9 @@ private:
     std::unique_ptr<sqlite3, Closing> handle_;
 };
 
+/// What a parameter that holds a test is marked with.
+inline constexpr const char* kSQLTestPointer = "SQLTest";
+
 /// A prepared statement, which must not outlive its database. Parameters and columns count from 1 and from 0, as in
 /// SQLite. Operations throw SQLFailure.
 class SQLStatement {
@@ -53,6 +58,8 @@ public:
     /// The bytes must stay until the statement was run.
     SQLStatement& bindBytes(int parameter, std::string_view bytes);
     SQLStatement& bindNull(int parameter);
+    /// The test must stay until the statement was run.
+    SQLStatement& bindTest(int parameter, const SQLTest& test);
     template <class Value>
     SQLStatement& bind(int parameter, const std::optional<Value>& value)
     {
@@ -67,6 +74,8 @@ public:
     void reset();
 
     bool isNull(int column) const;
+    bool isText(int column) const;
+    bool isReal(int column) const;
     std::int64_t number(int column) const;
     double real(int column) const;
     /// Text or bytes, valid until the next step.

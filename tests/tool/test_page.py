@@ -140,6 +140,23 @@ class Written(PageTest):
         self.assertEqual([rows["d"][name] for name in ("tempo", "duration", "note")], [None, None, -1])
         self.assertEqual([bool((row["more"] or {}).get("gone")) for _, row in sorted(rows.items())], [False] * 4 + [True])
 
+    def test_the_question_decides_and_the_index_is_brought_up_to_date(self):
+        self.add("a/one.wav", loop(0.2))
+        self.add("b/two.wav", loop(3))
+        self.index()
+        self.add("b/three.wav", loop(2))
+        for options, names, title in ((("Loops/a",), ["one.wav"], "a"), (("--longer", "1s"), ["two.wav"], "b"),
+                                      (("two", "--heading", "A & B"), ["two.wav"], "A &amp; B"),
+                                      (("--fresh", "--sort", "duration"), ["one.wav", "three.wav", "two.wav"], "Loops"), (("nothing",), [], "Sounds")):
+            self.page(*options)
+            self.assertEqual([row["name"] for row in self.data()["rows"]], names)
+            self.assertIn(f"<h1>{title}</h1>", (self.folder / "library.html").read_text(encoding="utf-8"))
+
+    def test_more_rows_than_a_page_holds(self):
+        made_index(self.folder / "l.db", 100_001)
+        self.assertIn("more than 100000 sounds", self.failure("page", "--db", "l.db", "-o", "library.html"))
+        self.assert_no_litter(*(name for name in ("l.db", "l.db-wal", "l.db-shm") if (self.folder / name).exists()), "Loops")
+
     def test_previews_are_of_what_browsers_do_not_play(self):
         for name in ("tone-16.aiff", "tone-16.wav", "tone-adpcm.wav", "pluck-24-le.caf"):
             shutil.copy(MEDIA / name, self.sounds)
@@ -223,20 +240,22 @@ class Browsing(PageTest):
 def made_index(path, count):
     import sqlite3
     made = random.Random(count)
-    schema = re.search(r'R"sql\((.*?)\)sql"', (ROOT / "tool/shared/library/LibrarySchema.cpp").read_text(encoding="utf-8"), re.S).group(1)
+    none = path.parent / "none"
+    none.mkdir(exist_ok=True)
+    subprocess.run([KTFILES, "index", none, "--db", path, "--quiet"], check=True)
+    none.rmdir()
     database = sqlite3.connect(path)
-    database.executescript(schema + "PRAGMA application_id = 1263814249; PRAGMA user_version = 1;")
-    database.execute("INSERT INTO folders VALUES(1, '/made/Loops/', 'Loops')")
+    database.execute("INSERT INTO folders(id, path, words) VALUES(1000, '/made/Loops/', 'Loops')")
     blobs = [bytes(made.randrange(256) for _ in range(2800)) for _ in range(20)]
     names = "C C# D Eb E F F# G Ab A Bb B".split()
     for i in range(1, count + 1):
         note, mode, kind = made.randrange(12), made.choice(("major", "minor", "both", "neither")), made.choice(("loop", "one-shot", "recording"))
         database.execute(
             "INSERT INTO files(id, folder, name, size, modified, indexed, state, kind, container_name, duration_seconds, tempo, key_note, mode, key, category) "
-            "VALUES(?, 1, ?, 1, 1, 1, 'whole', ?, ?, ?, ?, ?, ?, ?, ?)",
+            "VALUES(?, 1000, ?, 1, 1, 1, 'whole', ?, ?, ?, ?, ?, ?, ?, ?)",
             (i, f"{made.choice(('Shaker', 'Été', 'Sub', 'Pluck'))} {i}.wav", kind, made.choice(("WAVE", "AIFF", "CAF")), made.uniform(0.1, 90),
              made.choice((60, 90, 120, 121.5, 240)), note, mode, f"{names[note]} {mode}", made.choice(("Bass", "Drums", None))))
-        database.execute("INSERT INTO overviews VALUES(?, 256, ?)", (i, made.choice(blobs)))
+        database.execute("INSERT INTO overviews(file, frames_per_point, points) VALUES(?, 256, ?)", (i, made.choice(blobs)))
     database.commit()
     rows = [dict(zip(("name", "kind", "format", "duration", "tempo", "note", "mode", "category"), row)) for row in database.execute(
         "SELECT name, kind, container_name, duration_seconds, tempo, key_note, mode, category FROM files ORDER BY id")]

@@ -107,10 +107,11 @@ CREATE INDEX files_by_key ON files(key_note, mode, tempo);
 CREATE INDEX files_by_duration ON files(duration_seconds);
 CREATE INDEX files_by_category ON files(category, tempo);
 CREATE INDEX files_by_rate ON files(sample_rate);
--- There are few forms; whoever asks for a kind, container, number of channels or rate looks through all of them.
+-- There are few forms; whoever asks for a kind, container, number of channels or rate goes from one to the next.
 CREATE INDEX files_by_form ON files(
     coalesce(kind, '') || char(9) || coalesce(container_name, '') || char(9) || coalesce(channels, '') || char(9) ||
-    coalesce(sample_rate, ''));
+    coalesce(sample_rate, ''),
+    duration_seconds);
 CREATE INDEX files_by_state ON files(state) WHERE state <> 'whole';
 CREATE INDEX files_by_sound ON files(sound_hash) WHERE sound_hash IS NOT NULL;
 CREATE INDEX copied_files ON files(sound_hash) WHERE copied = 1;

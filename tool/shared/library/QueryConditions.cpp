@@ -133,15 +133,9 @@ QueryConditions::QueryConditions(SQLDatabase& database, const SearchTokenizer& t
 {
     addTests(database);
     addScopes(database, query);
-    std::vector<SQLText> choices;
-    for (const NumberRange& tempo : wantedTempos(query))
-        choices.push_back(within("tempo", tempo));
-    addIndexed(std::exchange(choices, {}));
-    for (const KeyChoice& key : wantedKeys(query))
-        choices.push_back(isKey(key));
-    addIndexed(std::exchange(choices, {}));
+    addMusic(query);
     if (query.seconds)
-        addIndexed({within("duration_seconds", *query.seconds)});
+        require(within("f.duration_seconds", *query.seconds));
     if (query.modifiedSince)
         addIndexed({{"modified >= ?", {*query.modifiedSince}}});
     addForms(query);
@@ -156,6 +150,23 @@ QueryConditions::QueryConditions(SQLDatabase& database, const SearchTokenizer& t
     addText("f.title", query.title);
     addText("f.album", query.album);
     addTextSelections(query);
+}
+
+// The index by keys goes on with tempos, so that both together select few rows.
+void QueryConditions::addMusic(const LibraryQuery& query)
+{
+    std::vector<SQLText> keys, tempos, both;
+    for (const NumberRange& tempo : wantedTempos(query))
+        tempos.push_back(within("tempo", tempo));
+    for (const KeyChoice& key : wantedKeys(query))
+        keys.push_back(isKey(key));
+    for (const SQLText& key : keys)
+        for (const SQLText& tempo : tempos) {
+            SQLText pair = key;
+            pair.append(tempo, " AND ");
+            both.push_back(std::move(pair));
+        }
+    addIndexed(!both.empty() ? both : keys.empty() ? tempos : keys);
 }
 
 void QueryConditions::addTextSelections(const LibraryQuery& query)
@@ -235,11 +246,10 @@ void QueryConditions::addScopes(SQLDatabase& database, const LibraryQuery& query
     selections_.push_back(selection);
 }
 
-// Goes from form to form along the index, and takes the rows of those that pass.
+// Goes from form to form along the index, which goes on with durations, and takes the rows of those that pass.
 void QueryConditions::addForms(const LibraryQuery& query)
 {
-    if (query.kind.empty() && query.containers.empty() && !query.channels && !query.sampleRate)
-        return;
+    const bool asksForForm = !query.kind.empty() || !query.containers.empty() || query.channels || query.sampleRate;
     if (!query.kind.empty())
         require({"f.kind = ?", {query.kind}});
     SQLText containers;
@@ -251,20 +261,29 @@ void QueryConditions::addForms(const LibraryQuery& query)
         require(within("f.channels", *query.channels));
     if (query.sampleRate)
         require(within("f.sample_rate", *query.sampleRate));
-    selections_.push_back(
-        {fmt::format("WITH RECURSIVE forms(form) AS (SELECT min({0}) FROM files UNION ALL SELECT (SELECT {0} FROM "
-                     "files WHERE {0} > form ORDER BY {0} LIMIT 1) FROM forms WHERE form IS NOT NULL) "
-                     "SELECT id FROM forms CROSS JOIN files INDEXED BY files_by_form ON {0} = form "
-                     "WHERE passes(form, ?)",
-                     kForm),
-         {keep(std::make_unique<IsForm>(query))}});
+    const SQLText seconds = query.seconds ? within("duration_seconds", *query.seconds) : SQLText();
+    SQLText selection{"SELECT id FROM files", {}};
+    if (asksForForm)
+        selection = {
+            fmt::format("WITH RECURSIVE forms(form) AS (SELECT min({0}) FROM files UNION ALL SELECT (SELECT {0} FROM "
+                        "files WHERE {0} > form ORDER BY {0} LIMIT 1) FROM forms WHERE form IS NOT NULL) "
+                        "SELECT id FROM forms CROSS JOIN files INDEXED BY files_by_form ON {0} = form "
+                        "WHERE passes(form, ?)",
+                        kForm),
+            {keep(std::make_unique<IsForm>(query))}};
+    if (query.seconds)
+        selection.append(seconds, asksForForm ? " AND " : " WHERE ");
+    if (asksForForm || query.seconds)
+        selections_.push_back(selection);
 }
 
 void QueryConditions::addProblems(const LibraryQuery& query)
 {
     if (query.takesAnyProblem) {
         require({"(f.state <> 'whole' OR EXISTS (SELECT 1 FROM findings p WHERE p.file = f.id))", {}});
-        selections_.push_back({"SELECT file FROM findings UNION ALL SELECT id FROM files WHERE state <> 'whole'", {}});
+        selections_.push_back({"SELECT file FROM findings UNION ALL "
+                               "SELECT id FROM files INDEXED BY files_by_state WHERE state <> 'whole'",
+                               {}});
         return;
     }
     SQLText either, rows;

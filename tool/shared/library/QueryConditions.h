@@ -45,6 +45,7 @@ private:
     void addTextSelections(const LibraryQuery& query);
     void addScopes(SQLDatabase& database, const LibraryQuery& query);
     void addForms(const LibraryQuery& query);
+    void addMusic(const LibraryQuery& query);
     void addProblems(const LibraryQuery& query);
     void require(const SQLText& condition) { ofRow_.append(condition, " AND "); }
     /// A condition that selects rows as well.

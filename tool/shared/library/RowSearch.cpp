@@ -41,10 +41,10 @@ RowSearch::Effort::Effort(SQLDatabase& database)
     const auto rows = static_cast<std::size_t>(std::max(database.number("SELECT max(id) FROM files"), std::int64_t{0}));
     constexpr std::size_t least = 100;
     rowsAtFirst = rows / 250 + least;
-    textsAtFirst = rows / 1000 + least;
+    textsAtFirst = rows / 2000 + least;
     fewRows = rows / 50 + least;
-    sortedRows = rows / 16 + least;
-    readTexts = rows / 500 + least;
+    sortedRows = rows / 40 + least;
+    readTexts = rows / 1000 + least;
 }
 
 RowSearch::RowSearch(SQLDatabase& database, const LibraryQuery& query)
@@ -162,18 +162,14 @@ std::optional<RowSet> RowSearch::selectedRows()
     std::vector<const SQLText*> left;
     for (const SQLText& selection : conditions_.selections())
         left.push_back(&selection);
-    const auto takeUpTo = [&](std::size_t most, std::size_t enough) {
-        std::erase_if(left, [&](const SQLText* selection) {
-            return (!chosen || chosen->size() > enough) && take(*selection, most);
-        });
-    };
-    takeUpTo(effort_.fewRows, 0);
+    std::erase_if(left, [&](const SQLText* selection) { return take(*selection, effort_.fewRows); });
     bool areTextsTaken = true;
     for (const SQLText& selection : conditions_.textSelections())
         areTextsTaken = areTextsTaken && (!chosen || chosen->size() > effort_.readTexts) && take(selection, kAll);
     areTermsMet_ = areTermsMet_ || areTextsTaken;
-    takeUpTo(effort_.sortedRows, effort_.sortedRows);
-    takeUpTo(kAll, effort_.sortedRows);
+    for (const SQLText* const selection : left)
+        if (!chosen || chosen->size() > effort_.sortedRows)
+            take(*selection, kAll);
     return chosen;
 }
 

@@ -343,11 +343,12 @@ class IndexRecords(CommandTest):
         shutil.copy(MEDIA / "bassline.aiff", self.folder)
         self.encoded("tone.mp3", "-metadata", "title=T")
         for name in ("loop.wav", "bassline.aiff", "tone.mp3"):
-            good = self.failing(name, "pread64", 0)
+            good = self.failing(name, "")
             self.assertEqual(good["state"], "whole", name)
             failed = 0
-            for number in range(1, 50):
-                record = self.failing(name, "pread64", number)
+            # One read, and all from one on: what is read ahead is read again where that fails.
+            for number, many in ((number, many) for number in range(1, 50) for many in ("", "+")):
+                record = self.failing(name, f"{number}{many}")
                 if record is None:
                     break
                 if record["state"] == "whole":
@@ -355,18 +356,18 @@ class IndexRecords(CommandTest):
                 else:
                     failed += 1
                     self.assertTrue(any(problem["text"] for problem in record["problems"]), (name, number, record))
-            self.assertGreater(failed, 1, name)
+            self.assertGreater(failed, 0, name)
 
-    def failing(self, name, call, number):
-        """The record that is made when the call of that number on the file fails; 0: none. None: there are not so many."""
+    def failing(self, name, which):
+        """The record that is made when those reads of the file fail, as strace counts them. None: there are not so many."""
         log = self.folder / "log"
-        inject = ["-e", f"inject={call}:error=EIO:when={number}"] if number else []
-        trace = ["strace", "-f", "-o", log, "-P", name, "-e", f"trace={call}", *inject]
+        inject = ["-e", f"inject=pread64:error=EIO:when={which}"] if which else []
+        trace = ["strace", "-f", "-o", log, "-P", name, "-e", "trace=pread64", *inject]
         # A sanitizer cannot look for leaks in a process that is traced already.
         environment = {**os.environ, "ASAN_OPTIONS": os.environ.get("ASAN_OPTIONS", "") + ":detect_leaks=0"}
         result = subprocess.run([*trace, KTFILES, "index", "--records", "--jsonl", "-j1", name], cwd=self.folder, capture_output=True,
                                 timeout=60, env=environment)
-        if number and b"INJECTED" not in log.read_bytes():
+        if which and b"INJECTED" not in log.read_bytes():
             return None
         record, = (each for each in map(json.loads, result.stdout.splitlines()) if "root" not in each)
         record.pop("indexed", None)

@@ -14,6 +14,8 @@
 #include <string_view>
 #include <vector>
 
+class CAudioFileIO;
+
 /// All tags as plain values; nothing of the file stays open.
 struct KT_EXPORT LoopTags {
     /// A chunk that is carried uninterpreted.
@@ -49,6 +51,8 @@ struct KT_EXPORT LoopTags {
 /// Reads everything known of a file as a loop, and only the sizes of chunks that are not interpreted. Null for a file
 /// that cannot be read, and for one of another kind (LoopTagsError.h).
 KT_EXPORT std::optional<LoopTags> readLoopTags(const platform::URLRef& file, platform::Error* error = nullptr);
+/// The same of a file that is open and described (CAudioFileIO::Open), through its read cache.
+KT_EXPORT std::optional<LoopTags> readLoopTags(CAudioFileIO& file, platform::Error* error = nullptr);
 /// The same for edits: of AIFF and CAF files the loop chunks alone, of WAVE its own chunks.
 KT_EXPORT std::optional<LoopTags> readOwnLoopTags(const platform::URLRef& file, platform::Error* error = nullptr);
 /// Adds the values of `sampler` where the tags have none.

@@ -1,5 +1,6 @@
 // How a file is read, and which of its chunks hold what.
 #include "audiofile/CAudioFileIO.h"
+#include "audiofile/FileWindow.h"
 #include "loops/VireoLoopUserDataUtils.h"
 #include "loops/tags/LoopTagFields.h"
 #include "loops/tags/LoopTags.h"
@@ -7,6 +8,7 @@
 #include "media/containers/ContainerHeaders.h"
 
 #include <algorithm>
+#include <functional>
 
 using platform::AudioFile;
 
@@ -21,7 +23,10 @@ Chunk& addChunk(VireoLoopChunkList& list)
     return added;
 }
 
-void readLength(AudioFile& file, const platform::URLRef& url, LoopTags& tags)
+// The frames of compressed sound without the padding of packets; none if they are not known.
+using FrameCount = std::function<std::optional<std::int64_t>()>;
+
+void readLength(AudioFile& file, const FrameCount& frames, LoopTags& tags)
 {
     platform::StreamDescription format;
     std::uint64_t packets = 0;
@@ -29,9 +34,8 @@ void readLength(AudioFile& file, const platform::URLRef& url, LoopTags& tags)
         return;
     tags.sampleRate = format.sampleRate;
     tags.frames = packets * format.framesPerPacket;
-    CAudioFileIO description;
-    if (!format.isLinearPCM() && description.Open(CFileRef(url), 0) == kStatusOK)
-        tags.frames = static_cast<std::uint64_t>(description.Info().frames); // without padding of packets
+    if (const auto counted = format.isLinearPCM() ? std::nullopt : frames())
+        tags.frames = static_cast<std::uint64_t>(*counted);
 }
 
 // The size of a chunk's body; none if the file does not have the chunk.
@@ -109,12 +113,9 @@ std::string sourceName(FourCC id)
     return id == fourCC("INFO") || id == fourCC("adtl") ? "LIST " + fourCCText(id) : fourCCText(id);
 }
 
-std::optional<LoopTags> readTags(const platform::URLRef& url, bool withSamplers, platform::Error* error)
+std::optional<LoopTags> readTags(std::unique_ptr<AudioFile> opened, const FrameCount& frames, bool withSamplers,
+                                 platform::Error* error)
 {
-    std::int32_t status = kStatusParameterError;
-    auto opened = url != nullptr ? AudioFile::openToRead(*url, &status) : nullptr;
-    if (!hasOpened(status, error))
-        return std::nullopt;
     VireoLoopChunksManager manager(std::move(opened));
     AudioFile& file = *manager.audioFile();
     std::optional<LoopTags> read(std::in_place);
@@ -125,7 +126,7 @@ std::optional<LoopTags> readTags(const platform::URLRef& url, bool withSamplers,
         failWith(error, LoopTagsError::otherFile, "is an AU file; those hold no tags");
         return std::nullopt;
     }
-    readLength(file, url, tags);
+    readLength(file, frames, tags);
     if (holdsLoopChunks)
         readLoopChunks(manager, tags);
     if (withSamplers || !holdsLoopChunks) {
@@ -135,6 +136,20 @@ std::optional<LoopTags> readTags(const platform::URLRef& url, bool withSamplers,
         addSamplerTags(tags, std::move(sampler));
     }
     return read;
+}
+
+std::optional<LoopTags> readTags(const platform::URLRef& url, bool withSamplers, platform::Error* error)
+{
+    std::int32_t status = kStatusParameterError;
+    auto opened = url != nullptr ? AudioFile::openToRead(*url, &status) : nullptr;
+    if (!hasOpened(status, error))
+        return std::nullopt;
+    const FrameCount frames = [&url]() -> std::optional<std::int64_t> {
+        CAudioFileIO description;
+        return description.Open(CFileRef(url), 0) == kStatusOK ? std::optional(description.Info().frames)
+                                                               : std::nullopt;
+    };
+    return readTags(std::move(opened), frames, withSamplers, error);
 }
 
 } // namespace
@@ -178,6 +193,18 @@ std::vector<LoopTags::Chunk> loopChunksOf(VireoLoopChunksManager& manager)
 std::optional<LoopTags> readLoopTags(const platform::URLRef& file, platform::Error* error)
 {
     return readTags(file, true, error);
+}
+
+std::optional<LoopTags> readLoopTags(CAudioFileIO& file, platform::Error* error)
+{
+    std::int32_t status = kStatusNotOpen;
+    const CFileBytes bytes(file);
+    auto opened = file.IsOpen() ? AudioFile::openToRead(bytes, static_cast<std::uint64_t>(file.LengthAtOpen()), &status)
+                                : nullptr;
+    if (!hasOpened(status, error))
+        return std::nullopt;
+    return readTags(
+        std::move(opened), [&file] { return std::optional(file.Info().frames); }, true, error);
 }
 
 std::optional<LoopTags> readOwnLoopTags(const platform::URLRef& file, platform::Error* error)

@@ -28,11 +28,16 @@ std::int32_t failure()
 
 FileBytes::~FileBytes()
 {
-    systemCalls().close(descriptor_);
+    if (lent_ == nullptr)
+        systemCalls().close(descriptor_);
 }
 
 std::int32_t FileBytes::length(std::uint64_t& length) const
 {
+    if (lent_ != nullptr) {
+        length = lentLength_;
+        return kStatusOK;
+    }
     FileStatus status;
     if (!systemCalls().status(descriptor_, &status))
         return failure();
@@ -45,6 +50,8 @@ std::int32_t FileBytes::readSome(std::uint64_t position, void* to, std::size_t c
     got = 0;
     if (!inFileRange(position, count))
         return kStatusParameterError;
+    if (lent_ != nullptr)
+        return lent_->readSome(position, to, count, got);
     while (got < count) {
         const std::int64_t step = systemCalls().pread(descriptor_, static_cast<std::byte*>(to) + got, count - got,
                                                       static_cast<std::int64_t>(position + got));

@@ -10,10 +10,13 @@
 
 namespace platform {
 
-/// Owns the descriptor. Operations return 0 or a negative status code.
+/// Owns the descriptor, or reads what a caller has open, which then is only read. Operations return 0 or a negative
+/// status code.
 class FileBytes final : public ByteSource {
 public:
     explicit FileBytes(int descriptor) : descriptor_(descriptor) {}
+    /// Borrows the bytes, `length` of them.
+    FileBytes(const ByteSource& lent, std::uint64_t length) : lent_(&lent), lentLength_(length) {}
     ~FileBytes();
     FileBytes(const FileBytes&) = delete;
     FileBytes& operator=(const FileBytes&) = delete;
@@ -32,7 +35,9 @@ public:
     std::int32_t flush() const;
 
 private:
-    int descriptor_;
+    int descriptor_ = -1; // none if the bytes are lent
+    const ByteSource* lent_ = nullptr;
+    std::uint64_t lentLength_ = 0;
 };
 
 } // namespace platform

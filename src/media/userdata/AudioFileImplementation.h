@@ -19,6 +19,8 @@ struct AudioFile::Implementation {
     Implementation(int descriptor, Permission access) : bytes(descriptor), isWritable(access == Permission::readWrite)
     {
     }
+    /// Only read; the bytes must outlive it.
+    Implementation(const ByteSource& lent, std::uint64_t length) : bytes(lent, length), isWritable(false) {}
 
     std::int32_t scan();
     std::int32_t scan(std::uint64_t fileLength);

@@ -49,6 +49,15 @@ std::unique_ptr<AudioFile> AudioFile::openToRead(const URL& url, std::int32_t* s
     return openAny(url, Permission::read, status != nullptr ? *status : ignored);
 }
 
+std::unique_ptr<AudioFile> AudioFile::openToRead(const ByteSource& bytes, std::uint64_t length, std::int32_t* status)
+{
+    auto implementation = std::make_unique<Implementation>(bytes, length);
+    const std::int32_t result = implementation->scan(length);
+    if (status != nullptr)
+        *status = result;
+    return result == kStatusOK ? std::unique_ptr<AudioFile>(new AudioFile(std::move(implementation))) : nullptr;
+}
+
 std::unique_ptr<AudioFile> AudioFile::openAny(const URL& url, Permission permission, std::int32_t& result)
 {
     const std::string& path = url.posixPath();

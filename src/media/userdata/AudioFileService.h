@@ -15,6 +15,8 @@
 
 namespace platform {
 
+class ByteSource;
+
 /// An open audio file; the destructor closes it. Operations return 0 or a negative status code (core/Status.h). While
 /// a file is open for reading, chunk headers are kept once read: later writes of others are seen when it is opened
 /// anew.
@@ -47,6 +49,8 @@ public:
     /// Opens a file for reading: what open() takes, and the containers that are only read, big-endian WAVE (RIFX),
     /// Wave64 and AU. kStatusParameterError for others.
     static std::unique_ptr<AudioFile> openToRead(const URL& url, std::int32_t* status);
+    /// The same for `length` bytes that the caller has open, and that must outlive the result.
+    static std::unique_ptr<AudioFile> openToRead(const ByteSource& bytes, std::uint64_t length, std::int32_t* status);
     /// Creates a file without samples, open for reading and writing. `fileType` is "WAVE", "AIFF", "AIFC" or "caff";
     /// the format is linear PCM that the container can hold: little-endian in WAVE (8 bits unsigned), big-endian in
     /// AIFF, which has no floats. kStatusParameterError for others; kStatusDuplicateName when the file exists, unless

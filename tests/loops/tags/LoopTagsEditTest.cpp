@@ -1,6 +1,7 @@
 // Loop tags as hosts set them, in one call: what they ask for, what is refused, and that others are held back
 // meanwhile.
 #include "loops/tags/LoopTagsEdit.h"
+#include "audiofile/CAudioFileIO.h"
 #include "loops/tags/LoopTagsError.h"
 #include "media/AudioContainers.h"
 #include "media/containers/ContainerHeaders.h"
@@ -61,6 +62,31 @@ protected:
 };
 
 } // namespace
+
+TEST_F(LoopTagsEdit, IsReadOfAnOpenFileAsOfAPath)
+{
+    CAudioFileIO open;
+    EXPECT_FALSE(readLoopTags(open, &error)) << "not open";
+    for (const FourCC container : {kAIFF, kCAF}) {
+        const std::string path = file(container);
+        ASSERT_EQ(set(path, {{"beatCount", 8}, {"title", "Open"}}), 0) << error.description;
+        open.SetCache(1 << 16);
+        ASSERT_EQ(open.Open(CFileRef(path.c_str(), false), 0), kStatusOK);
+        const auto tags = readLoopTags(open, &error);
+        ASSERT_TRUE(tags) << error.description;
+        const auto byPath = readLoopTags(urlOf(path));
+        EXPECT_EQ(tags->combined, byPath->combined);
+        EXPECT_EQ(tags->info, byPath->info);
+        EXPECT_EQ(tags->frames, byPath->frames);
+        EXPECT_EQ(tags->tempo(), byPath->tempo());
+        EXPECT_TRUE(tags->isLoop());
+        EXPECT_TRUE(open.IsOpen()) << "and remains so";
+    }
+    const std::string text = folder.write("text", "no sound at all");
+    ASSERT_EQ(open.Open(CFileRef(text.c_str(), false), 0), kStatusOK);
+    EXPECT_FALSE(readLoopTags(open, &error));
+    EXPECT_EQ(error.code, static_cast<std::int64_t>(LoopTagsError::unknownFile));
+}
 
 TEST_F(LoopTagsEdit, SetsWhatIsNamedAndKeepsTheRest)
 {

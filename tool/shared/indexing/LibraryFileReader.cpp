@@ -99,7 +99,7 @@ private:
         describeOpened(file, path_);
         addSound(record_, file.Info());
         addProblems(file);
-        addTags(file, location);
+        addTags(file);
         addSamples(file);
     }
 
@@ -126,11 +126,11 @@ private:
         record_.state = record_.problems.empty() && file.Info().IsWhole() ? "whole" : "damaged";
     }
 
-    void addTags(CAudioFileIO& file, const platform::URLRef& location)
+    void addTags(CAudioFileIO& file)
     {
         platform::Error error;
         if (file.HasChunks()) {
-            if (auto tags = readLoopTags(location, &error))
+            if (auto tags = readLoopTags(file, &error))
                 addLoopTags(record_, std::move(*tags));
             else
                 noteFailure(error);

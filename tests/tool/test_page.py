@@ -282,6 +282,7 @@ class Table(Browsing):
                 ("tempo=..90", lambda r: r["tempo"] <= 90),
                 ("tempo=120..120&related=1", lambda r: r["tempo"] in (60, 120, 240)),
                 ("key=F%23+minor", lambda r: note(r, (6, "minor"))),
+                ("key=Gb+minor", lambda r: note(r, (6, "minor"))),
                 ("key=F%23+minor&related=1", lambda r: note(r, (6, "minor"), (6, "major"), (9, "major"))),
                 ("key=C+major&related=1", lambda r: note(r, (0, "major"), (0, "minor"), (9, "minor"))),
                 ("category=Bass&kind=loop", lambda r: r["category"] == "Bass" and r["kind"] == "loop"),

@@ -40,7 +40,7 @@ class Page {
         };
         add(byId("key"), "-1", "Any");
         for (let key = 0; key < 24; ++key)
-            add(byId("key"), String(key), keyName(key));
+            add(byId("key"), String(key), keyLabel(key));
         for (const name of ["category", "kind", "format"]) {
             const select = byId(name);
             add(select, "", "Any");

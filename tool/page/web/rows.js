@@ -3,7 +3,8 @@
 
 const ROW_FIELDS = ["folder", "name", "tempo", "key", "note", "mode", "duration", "category", "kind", "format", "detail", "type", "wave", "more"];
 const COLUMNS = ["name", "tempo", "key", "duration", "category", "kind", "format"];
-const NOTES = ["C", "C♯", "D", "E♭", "E", "F", "F♯", "G", "A♭", "A", "B♭", "B"];
+const NOTES = ["C", "C♯", "D", "D♯", "E", "F", "F♯", "G", "G♯", "A", "A♯", "B"];
+const FLATS = {1: "D♭", 3: "E♭", 6: "G♭", 8: "A♭", 10: "B♭"};
 
 /** What a search compares: without accents, in small letters, sharps and flats as they are typed. */
 function plain(text) {
@@ -165,9 +166,15 @@ function keyTest(key, related, texts) {
     };
 }
 
-/** "F♯ minor" */
-function keyName(key) {
-    return `${NOTES[key >> 1]} ${key & 1 ? "minor" : "major"}`;
+/** "F♯ minor", or with flats "G♭ minor"; white keys have one name. */
+function keyName(key, notes = NOTES) {
+    return `${notes[key >> 1] || NOTES[key >> 1]} ${key & 1 ? "minor" : "major"}`;
+}
+
+/** "F♯ / G♭ minor" */
+function keyLabel(key) {
+    const flat = FLATS[key >> 1];
+    return flat ? keyName(key).replace(" ", ` / ${flat} `) : keyName(key);
 }
 
 function emptyFilters() {
@@ -182,7 +189,7 @@ function fragmentOf(filters) {
     if (filters.from !== null || filters.to !== null)
         parts.set("tempo", `${filters.from ?? ""}..${filters.to ?? ""}`);
     if (filters.key >= 0)
-        parts.set("key", keyName(filters.key).replace("♯", "#").replace("♭", "b"));
+        parts.set("key", keyName(filters.key).replace("♯", "#"));
     if (filters.related)
         parts.set("related", "1");
     for (const name of ["category", "kind", "format"])
@@ -202,7 +209,7 @@ function filtersOf(fragment) {
     filters.from = number(from);
     filters.to = number(to);
     const key = plain(parts.get("key") || "");
-    filters.key = [...Array(24).keys()].findIndex(i => plain(keyName(i)) === key);
+    filters.key = [...Array(24).keys()].findIndex(i => plain(keyName(i)) === key || plain(keyName(i, FLATS)) === key);
     filters.related = parts.get("related") === "1";
     for (const name of ["category", "kind", "format"])
         filters[name] = parts.get(name) || "";

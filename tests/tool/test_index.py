@@ -10,7 +10,7 @@ import subprocess
 import time
 import unittest
 
-from command import INSTRUMENTED, KTFILES, MEDIA, CommandTest, wave
+from command import INSTRUMENTED, KTFILES, LIBRARY, MEDIA, CommandTest, wave
 from test_failing_calls import TRACES
 
 KILLS = int(os.environ.get("KTFILES_KILLS", "20"))
@@ -221,6 +221,16 @@ class Index(IndexTest):
             self.assertIn(words, self.failure("index", "lib", "--db", name))
             self.assertEqual((self.folder / name).read_bytes(), before)
         self.assertEqual([name for name in os.listdir(self.folder) if name.endswith(("-wal", "-shm"))], [])
+
+    @unittest.skipUnless(shutil.which("setpriv") and os.geteuid() == 0, "nobody else can be run as")
+    def test_who_may_only_read_can_ask(self):
+        self.make("lib/a.wav")
+        self.index("lib", database="all %41 of us?.db")
+        tool = shutil.copytree(os.path.dirname(os.path.realpath(KTFILES)), self.folder / "tool", ignore=lambda _, names: set(names) - {"ktfiles"})
+        self.folder.chmod(0o755)
+        path = subprocess.run(["setpriv", "--reuid=65534", "--clear-groups", tool / "ktfiles", "find", "--db", self.folder / "all %41 of us?.db"],
+                              cwd=self.folder, capture_output=True, text=True, env={**os.environ, "LD_LIBRARY_PATH": str(LIBRARY.parent), "HOME": "/"})
+        self.assertEqual((path.returncode, path.stdout.count("a.wav")), (0, 1), path.stderr)
 
     def test_odd_names_and_links(self):
         names = [b"\xff\xfe.wav", b"two\nlines.wav", "é\U0010ff80.wav".encode(), b"-j", b"' or 1.wav"]

@@ -60,6 +60,7 @@ private:
     std::vector<std::string> kept_;           // folders that could not be looked into: what is below them stays
     std::vector<VanishedFile> vanished_;
     std::int64_t listed_ = 0;
+    bool knowsAudio_; // the index does, from the start
     UpdateInbox inbox_;
     ReadingPool pool_;
     std::optional<LibraryWalk> walk_;
@@ -70,6 +71,7 @@ LibraryUpdating::LibraryUpdating(Library& library, const LibraryUpdate& update)
       update_(update),
       known_(library.database()),
       batch_(library, changes_),
+      knowsAudio_(library.database().number("SELECT EXISTS (SELECT 1 FROM files)") != 0),
       pool_(inbox_, update.reading, update.threads)
 {
 }
@@ -118,8 +120,11 @@ void LibraryUpdating::gather()
         const auto soon = UpdateClock::now() + kLookAround;
         UpdateInbox::Contents found = inbox_.take(pool_.pending() < kMostPending, std::min(soon, batch_.due()));
         isWalkOver = isWalkOver || found.isWalkOver;
-        for (FolderListing& listing : found.listings)
-            compare(std::move(listing));
+        if (!found.listings.empty()) {
+            const SQLSnapshot snapshot(library_.database()); // rather than one for each question
+            for (FolderListing& listing : found.listings)
+                compare(std::move(listing));
+        }
         pool_.took(found.readings.size());
         for (FileReading& reading : found.readings)
             take(std::move(reading));
@@ -147,7 +152,7 @@ void LibraryUpdating::compare(FolderListing found)
     if (found.error != 0)
         keep(found.path, SystemErrorText(found.error));
     if (found.isMount && !known_.isMount(found.path))
-        batch_.noteMount(found.path, found.words, true);
+        batch_.noteMount(found.path, found.words);
     if (found.isRoot && found.isWhole && !isKept(found.path) && found.files.empty() && found.folders.empty() &&
         known_.knowsBelow(found.path) && !update_.prunes)
         return keep(found.path, "is empty, as where a volume is not mounted; what the index knows of it is kept");
@@ -201,7 +206,7 @@ void LibraryUpdating::compare(FolderListing found)
 
 void LibraryUpdating::compareNew(const std::shared_ptr<const FolderListing>& folder, std::size_t file)
 {
-    for (VanishedFile& old : known_.withInodeOf(folder->files[file]))
+    for (VanishedFile& old : knowsAudio_ ? known_.withInodeOf(folder->files[file]) : std::vector<VanishedFile>())
         if (!isKept(old.folder) && old.isGone() && deviceOfNearest(old.folder) == folder->device)
             return batch_.move(std::move(old), {folder, file, true});
     pool_.give({folder, file, false});
@@ -277,7 +282,7 @@ void LibraryUpdating::tellUnmounted()
             if (isMountPoint(path) || isKept(path))
                 continue;
             if (update_.prunes)
-                batch_.noteMount(path, {}, false);
+                batch_.noteMount(path, {});
             else
                 keep(path, "is not mounted; what the index knows of it is kept (--prune removes it)");
         }

@@ -52,24 +52,24 @@ void UpdateBatch::move(VanishedFile from, ReadingJob to)
     noteWork();
 }
 
-void UpdateBatch::noteMount(const std::string& path, const std::string& words, bool isMounted)
+void UpdateBatch::noteMount(const std::string& path, const std::string& words)
 {
-    SQLTransaction transaction(library_.database());
-    writer_.begin();
-    writer_.setMounted(isMounted ? writer_.addFolder(path, words) : writer_.folderAt(path), isMounted);
-    transaction.commit();
+    mounts_.emplace_back(path, words);
+    noteWork();
 }
 
 std::vector<ReadingJob> UpdateBatch::write()
 {
     std::vector<ReadingJob> unmoved;
     due_ = std::chrono::steady_clock::time_point::max();
-    if (readings_.empty() && moves_.empty())
+    if (readings_.empty() && moves_.empty() && mounts_.empty())
         return unmoved;
     const std::vector<FileReading> readings = std::exchange(readings_, {});
     std::vector<Move> moves = std::exchange(moves_, {});
     SQLTransaction transaction(library_.database());
     writer_.begin();
+    for (const auto& [path, words] : std::exchange(mounts_, {}))
+        writer_.setMounted(words.empty() ? writer_.folderAt(path) : writer_.addFolder(path, words), !words.empty());
     for (Move& move : moves)
         if (!write(move)) {
             move.to.isKnown = false;

@@ -20,8 +20,8 @@ public:
     void put(FileReading reading);
     /// A file has moved, if nobody else has seen to it when this is written.
     void move(VanishedFile from, ReadingJob to);
-    /// Notes that a file system is mounted at a folder, or is none any more.
-    void noteMount(const std::string& path, const std::string& words, bool isMounted);
+    /// A file system is mounted at a folder, or, without words, is none any more.
+    void noteMount(const std::string& path, const std::string& words);
     /// When there is something to be written for long enough, or enough of it.
     std::chrono::steady_clock::time_point due() const { return due_; }
     /// Writes it; returns files that have not moved, and must be read.
@@ -49,5 +49,6 @@ private:
     SQLStatement seen_;
     std::vector<FileReading> readings_;
     std::vector<Move> moves_;
+    std::vector<std::pair<std::string, std::string>> mounts_; // paths and words
     std::chrono::steady_clock::time_point due_ = std::chrono::steady_clock::time_point::max();
 };

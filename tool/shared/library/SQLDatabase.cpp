@@ -2,7 +2,12 @@
 
 #include "tool/shared/library/SQLFailure.h"
 
+#include <fmt/format.h>
 #include <sqlite3.h>
+
+#include <cctype>
+#include <iterator>
+#include <unistd.h>
 
 namespace {
 
@@ -49,6 +54,27 @@ std::string wordsFor(sqlite3* handle, int code)
     }
 }
 
+// Readers of a database with a write-ahead log share files beside it, which they make. Where they cannot, and nobody
+// has it open for writing, the database is read as it is.
+bool cannotBeShared(const std::string& path)
+{
+    const std::size_t slash = path.rfind('/');
+    const std::string folder = slash == path.npos ? "." : path.substr(0, slash + 1);
+    return ::access(folder.c_str(), W_OK) != 0 && ::access((path + "-wal").c_str(), F_OK) != 0;
+}
+
+std::string unchangingURI(const std::string& path)
+{
+    std::string uri = path.starts_with('/') ? "file:" : "file:./";
+    for (const char c : path)
+        if (std::isalnum(static_cast<unsigned char>(c)) != 0 ||
+            std::string_view("/-_.~").find(c) != std::string_view::npos)
+            uri += c;
+        else
+            fmt::format_to(std::back_inserter(uri), "%{:02X}", static_cast<unsigned char>(c));
+    return uri + "?immutable=1";
+}
+
 } // namespace
 
 void failForSQL(sqlite3* handle, int code)
@@ -64,8 +90,13 @@ void SQLDatabase::Closing::operator()(sqlite3* handle) const
 SQLDatabase::SQLDatabase(const std::string& path, Mode mode) : path_(path)
 {
     sqlite3* handle = nullptr;
+    // Counting what is allocated takes a lock for each piece, and nobody asks for it.
+    static const int uncounted = sqlite3_config(SQLITE_CONFIG_MEMSTATUS, 0);
+    static_cast<void>(uncounted);
+    const bool isStill = mode == Mode::read && cannotBeShared(path);
     // One thread uses a connection at a time, which needs no locks inside it.
-    const int code = sqlite3_open_v2(path.c_str(), &handle, flagsOf(mode) | SQLITE_OPEN_NOMUTEX, nullptr);
+    const int code = sqlite3_open_v2((isStill ? unchangingURI(path) : path).c_str(), &handle,
+                                     flagsOf(mode) | SQLITE_OPEN_NOMUTEX | (isStill ? SQLITE_OPEN_URI : 0), nullptr);
     handle_.reset(handle);
     if (code != SQLITE_OK)
         failForSQL(handle, code);
@@ -222,6 +253,16 @@ std::string_view SQLStatement::bytes(int column) const
     const int size = sqlite3_column_bytes(statement_.get(), column);
     return bytes == nullptr ? std::string_view()
                             : std::string_view(static_cast<const char*>(bytes), static_cast<std::size_t>(size));
+}
+
+SQLSnapshot::SQLSnapshot(SQLDatabase& database) : database_(database)
+{
+    database.run("BEGIN");
+}
+
+SQLSnapshot::~SQLSnapshot()
+{
+    sqlite3_exec(database_.handle(), "ROLLBACK", nullptr, nullptr, nullptr); // nothing was written
 }
 
 SQLTransaction::SQLTransaction(SQLDatabase& database) : database_(&database)

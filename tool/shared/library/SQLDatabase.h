@@ -17,7 +17,7 @@ class SQLDatabase {
 public:
     /// What may be done with the file.
     enum class Mode {
-        read,  // it must exist, and nothing is written
+        read,  // it must exist, and nothing is written, nor are rights to write needed
         write, // it must exist
         create // it is made if it does not exist
     };
@@ -87,6 +87,18 @@ private:
         void operator()(sqlite3_stmt* statement) const;
     };
     std::unique_ptr<sqlite3_stmt, Finalizing> statement_;
+};
+
+/// Questions that are answered of one state of the database. No transaction may be begun meanwhile.
+class SQLSnapshot {
+public:
+    explicit SQLSnapshot(SQLDatabase& database);
+    ~SQLSnapshot();
+    SQLSnapshot(const SQLSnapshot&) = delete;
+    SQLSnapshot& operator=(const SQLSnapshot&) = delete;
+
+private:
+    SQLDatabase& database_;
 };
 
 /// Work that counts as a whole: undone unless `commit` is reached.

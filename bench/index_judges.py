@@ -234,7 +234,7 @@ def programs(ktfiles, folder, database):
             "mutagen": ["/usr/bin/python3", "-c", MUTAGEN, folder], "mediainfo": ["mediainfo", "--Output=JSON", folder], "exiftool": ["exiftool", "-r", "-json", folder]}
 
 
-# Who is right where a program says something else, by program, field and suffix; "*" is any suffix. The maker of the files knows what
+# Who is right where a program says something else, by program, field and suffix; "*" is any field. The maker of the files knows what
 # was made: where the index says the same, it is right.
 LATIN = "the index: the text is UTF-8, as the program that made the file writes it, and is taken for an older encoding"
 JUDGED = {
@@ -247,6 +247,7 @@ JUDGED = {
     ("mediainfo", "duration", "mp3"): "the index: silence that the encoder added is no sound; mediainfo counts it",
     ("mediainfo", "duration", "caf"): "the index, which says what was made",
     ("mediainfo", "duration", "wv"): "the index: mediainfo reads the first block only",
+    ("exiftool", "*", "caf"): "the index: exiftool knows no CAF, and takes what looks like it in the sound for another format",
     ("exiftool", "rate", "opus"): "the index: Opus is decoded at 48 kHz; the other rate is that of what was encoded, for information (RFC 7845)",
     ("mediainfo", "rate", "opus"): "the index, as beside exiftool",
     ("exiftool", "channels", "m4a"): "the index: the sample entry of AAC says 2 always, the configuration of the decoder says how many there are",
@@ -257,10 +258,7 @@ JUDGED = {
 
 
 def verdict(program, field, suffix):
-    for key in ((program, field, suffix), (program, field, "*")):
-        if key in JUDGED:
-            return JUDGED[key]
-    return None
+    return next((JUDGED[key] for key in ((program, field, suffix), (program, "*", suffix)) if key in JUDGED), None)
 
 
 def tell_fields(program, ours, theirs, tell):

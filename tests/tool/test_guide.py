@@ -24,6 +24,11 @@ class GuideTest(TypedTest):
         self.assertEqual(set(re.findall(r"\]\(([\w-]+\.md)\)", PAGES["README.md"])) - {"from-python.md"}, set(PAGES) - {"README.md", "from-python.md"})
 
 
+    @needs_decoders
+    def test_from_a_laptop_to_a_cluster(self):
+        self.assert_shows("from-a-laptop-to-a-cluster.md", PAGES["from-a-laptop-to-a-cluster.md"])
+
+
 @unittest.skipUnless(EXAMPLES, "the programs of examples/cpp are not built")
 class TypedGuideTest(TypedTest):
     """One test for each page that shows a program in C++."""

@@ -133,6 +133,7 @@ class MergeTest(CommandTest):
                 database.execute("INSERT OR IGNORE INTO seen SELECT id, ?, 1, 1, ?, 1, NULL FROM folders WHERE path = ?",
                                  (name, changed, "/m/sub/" if name == "d.wav" else "/m/"))
             database.execute("INSERT OR IGNORE INTO folders(path, words) VALUES('/m/sub/', 'sub/')")
+            database.execute("UPDATE folders SET mounted = 1 WHERE path = '/m/sub/'")
             database.execute("INSERT OR REPLACE INTO seen SELECT id, 'd.wav', 1, 1, ?, 1, NULL FROM folders WHERE path = '/m/sub/'", (STAMP["changed"] + 10**12,))
         results = set()
         for order in itertools.permutations(["0.db", "1.db", "2.db"]):
@@ -140,7 +141,7 @@ class MergeTest(CommandTest):
             self.merge(*order, *order[:1], db=db)
             with sqlite3.connect(self.folder / db) as database:
                 seen = database.execute("SELECT d.path, s.name, s.changed, s.file IS NULL FROM seen s JOIN folders d ON d.id = s.folder ORDER BY 1, 2").fetchall()
-                words = database.execute("SELECT path, words FROM folders WHERE path <> '/x/' ORDER BY 1").fetchall()
+                words = database.execute("SELECT path, words, mounted FROM folders WHERE path <> '/x/' ORDER BY 1").fetchall()
                 database.execute("INSERT INTO search(search, rank) VALUES('integrity-check', 1)")
             results.add((self.export(db), str(seen), str(words)))
         self.assertEqual(len(results), 1, "\n".join(map(str, results)))
@@ -149,7 +150,7 @@ class MergeTest(CommandTest):
         self.assertEqual(titles, {"/m/a.wav": "new", "/m/b.wav": "changed later", "/m/c.wav": "equal a", "/x/e.wav": None})
         self.assertIn('{"root":"/m/","completed":9}\n{"root":"/m/sub/"}\n', export)
         self.assertIn("'f.txt', 1, 1", seen)
-        self.assertEqual(words, str([("/m/", "m/"), ("/m/sub/", "m/sub/")]))
+        self.assertEqual(words, str([("/m/", "m/", 0), ("/m/sub/", "m/sub/", 1)]))
         for order in itertools.permutations(["0.jsonl", "1.jsonl", "2.jsonl"]):
             self.merge(*order, db="".join(order))
             self.assertEqual({path: record.get("title") for path, record in self.files("".join(order)).items()}, {**titles, "/m/sub/d.wav": None})

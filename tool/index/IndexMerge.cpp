@@ -99,6 +99,9 @@ private:
                 root.completed = roots.number(1);
             merge_.add(root);
         }
+        for (SQLStatement mounted(library.database(), "SELECT path, words FROM folders WHERE mounted = 1");
+             mounted.step();)
+            merge_.addMounted(nameOfIndexed(mounted.bytes(0)), nameOfIndexed(mounted.bytes(1)));
         RecordReader reader(library);
         IndexedFiles files(library, IndexedFiles::Which::all);
         while (const auto file = files.next()) {

@@ -54,8 +54,10 @@ LibraryMerge::LibraryMerge(Library& target)
 
 void LibraryMerge::begin()
 {
-    if (!transaction_)
-        transaction_.emplace(target_.database());
+    if (transaction_)
+        return;
+    transaction_.emplace(target_.database());
+    writer_->begin();
 }
 
 void LibraryMerge::endOfFile()
@@ -95,6 +97,13 @@ void LibraryMerge::add(const LibraryRoot& root)
     const std::int64_t row = writer_->addRoot(root.path);
     if (root.completed)
         completed_.bind(1, *root.completed).bind(2, row).run();
+}
+
+void LibraryMerge::addMounted(const std::string& path, const std::string& words)
+{
+    requireFolderPath(path);
+    begin();
+    writer_->setMounted(folder(path, words), true);
 }
 
 // Words of folders begin with the name of a root, or of a link in one that leads to the folder. Of several, the longest

@@ -27,6 +27,8 @@ public:
     explicit LibraryMerge(Library& target);
 
     void add(const LibraryRoot& root);
+    /// A folder at which a file system was mounted.
+    void addMounted(const std::string& path, const std::string& words);
     /// `words` is what a search looks at of the folder.
     void add(const LibraryRecord& record, const std::string& words);
     /// A file of another index, whose record is only read if it is needed.

@@ -23,9 +23,9 @@ constexpr std::uint32_t kDecoderDelay = 529; // frames, in every layer III decod
 /// Containers that may hold a few MP3 packets in a row, and must not be taken for a bare stream.
 bool isContainer(BytesView start)
 {
-    constexpr std::array ids = {fourCC("RIFF"),     fourCC("RIFX"),     fourCC("FORM"),    fourCC("caff"),
-                                fourCC("OggS"),     fourCC("fLaC"),     fourCC(".RMF"),    fourCC("FLV\1"),
-                                FourCC{0x1A45DFA3}, FourCC{0x3026B275}, FourCC{0x000001BA}};
+    constexpr std::array ids = {fourCC("RIFF"),  fourCC("RIFX"),     fourCC("FORM"),     fourCC("caff"),
+                                fourCC("OggS"),  fourCC("fLaC"),     fourCC("wvpk"),     fourCC(".RMF"),
+                                fourCC("FLV\1"), FourCC{0x1A45DFA3}, FourCC{0x3026B275}, FourCC{0x000001BA}};
     return start.size() >= 8 && (std::ranges::find(ids, loadBE<FourCC>(start.data())) != ids.end() ||
                                  loadBE<FourCC>(start.data() + 4) == fourCC("ftyp"));
 }

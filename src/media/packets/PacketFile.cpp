@@ -18,6 +18,9 @@ BytesView PacketFile::load(std::uint64_t position, std::size_t count)
 {
     if (position >= length_)
         return {};
+    // What reaches to the end of the file is all that there is.
+    if (const std::uint64_t end = windowStart_ + windowSize_; end == length_ && position >= windowStart_)
+        return {window_.data() + (position - windowStart_), std::min(count, static_cast<std::size_t>(end - position))};
     const auto wanted = static_cast<std::size_t>(std::min<std::uint64_t>(kWindowSize, length_ - position));
     if (window_.size() < wanted)
         window_.resize(wanted);

@@ -3,23 +3,11 @@
 
 #include "platform/SystemCalls.h"
 
-#include <sys/stat.h>
+#include <cstdint>
 
 namespace platform {
 
 /// Of the mode bits of `stat` and `statx`.
-inline FileKind kindOfMode(mode_t mode)
-{
-    switch (mode & S_IFMT) {
-    case S_IFREG:
-        return FileKind::file;
-    case S_IFDIR:
-        return FileKind::directory;
-    case S_IFLNK:
-        return FileKind::symbolicLink;
-    default:
-        return FileKind::other;
-    }
-}
+FileKind kindOfMode(std::uint32_t mode);
 
 } // namespace platform

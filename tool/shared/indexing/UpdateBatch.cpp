@@ -156,5 +156,5 @@ void UpdateBatch::finish(const std::vector<std::string>& complete, const std::ve
         writer_.removeRoot(path);
     transaction.commit();
     if (!changes_.areNone())
-        library_.database().run("PRAGMA optimize; PRAGMA wal_checkpoint(TRUNCATE)");
+        library_.database().run("PRAGMA optimize; PRAGMA wal_checkpoint(PASSIVE)");
 }

@@ -6,6 +6,7 @@
 #include <httplib.h>
 
 #include <algorithm>
+#include <exception>
 #include <string>
 
 namespace {
@@ -54,12 +55,17 @@ void send(const httplib::Request& request, httplib::Response& response, const st
     }
     // Given as a provider, it is not compressed, which would take longer than the way within the machine.
     if (size > 0)
-        response.set_content_provider(static_cast<std::size_t>(size), body->type(),
-                                      [body](std::size_t offset, std::size_t length, httplib::DataSink& sink) {
-                                          const std::string piece = body->read(static_cast<std::int64_t>(offset),
-                                                                               std::min(length, kPieceSize));
-                                          return !piece.empty() && sink.write(piece.data(), piece.size());
-                                      });
+        response.set_content_provider(
+            static_cast<std::size_t>(size), body->type(),
+            [body](std::size_t offset, std::size_t length, httplib::DataSink& sink) {
+                try {
+                    const std::string piece =
+                        body->read(static_cast<std::int64_t>(offset), std::min(length, kPieceSize));
+                    return !piece.empty() && sink.write(piece.data(), piece.size());
+                } catch (const std::exception&) { // for want of memory; it must not reach the thread of the server
+                    return false;
+                }
+            });
     else
         response.set_content("", body->type());
 }

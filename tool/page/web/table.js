@@ -2,13 +2,13 @@
 
 const OVERSCAN = 8;
 
-/** "1:23.4", of seconds; "" for what is not known. */
-function clock(seconds, digits = 1) {
+/** "1:23.4", of seconds, from an hour on "1:02:03"; "" for what is not known. */
+function clock(seconds) {
     if (seconds === null || !Number.isFinite(seconds))
         return "";
-    const scale = 10 ** digits, all = Math.round(seconds * scale) / scale;
+    const digits = seconds < 3599.5 ? 1 : 0, scale = 10 ** digits, all = Math.round(seconds * scale) / scale;
     const hours = Math.floor(all / 3600), minutes = Math.floor(all / 60) % 60, rest = (all % 60).toFixed(digits);
-    const padded = rest.padStart(digits > 0 ? 3 + digits : 2, "0");
+    const padded = rest.padStart(digits > 0 ? 4 : 2, "0");
     return hours > 0 ? `${hours}:${String(minutes).padStart(2, "0")}:${padded}` : `${minutes}:${padded}`;
 }
 

@@ -219,8 +219,8 @@ std::string PageDocument::policy()
 
 std::string PageDocument::text(const std::vector<PageRow>& rows) const
 {
-    const std::string folder = lastComponent(shownName(folderOfAll(rows)));
-    const std::string heading = escapedHtml(!title.empty() ? title : !folder.empty() ? folder : "Sounds");
+    const std::string common = lastComponent(shownName(folderOfAll(rows)));
+    const std::string heading = escapedHtml(!title.empty() ? title : !common.empty() ? common : "Sounds");
     const std::map<std::string_view, std::function<std::string()>> parts = {
         {"policy", [] { return policy(); }},
         {"title", [&] { return heading; }},

@@ -93,11 +93,11 @@ public:
 private:
     void addRecord(const LibraryChanges& changes)
     {
-        JsonWriter& json = records_.begin().beginObject().member("database", database_);
+        JsonWriter& json = records_.begin().beginObject().member("database", database_).key("counts").beginObject();
         json.member("added", changes.added).member("changed", changes.changed).member("moved", changes.moved);
         json.member("removed", changes.removed).member("unchanged", changes.same);
         json.member("passedOver", changes.passedOver).member("unreadable", changes.unreadable);
-        json.member("loops", changes.loops).member("problems", changes.problems).endObject();
+        json.member("loops", changes.loops).member("problems", changes.problems).endObject().endObject();
         records_.end();
     }
 

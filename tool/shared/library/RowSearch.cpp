@@ -44,6 +44,7 @@ RowSearch::Effort::Effort(SQLDatabase& database)
     textsAtFirst = rows / 2000 + least;
     fewRows = rows / 50 + least;
     sortedRows = rows / 40 + least;
+    passedOver = rows / 20 + least;
     readTexts = rows / 1000 + least;
 }
 
@@ -96,6 +97,10 @@ std::int64_t RowSearch::walk()
         const std::int64_t row = nextWalked();
         if (row == 0 || !chosen_ || chosen_->holds(row))
             return row;
+        if (++passedOver_ > effort_.passedOver && chosen_->size() <= effort_.sortedRows) {
+            sort(*chosen_);
+            return walk();
+        }
     }
 }
 
@@ -137,13 +142,12 @@ void RowSearch::settle()
     if (isByRow_) {
         list_ = rows->rows();
         listed_ = static_cast<std::size_t>(std::ranges::upper_bound(*list_, last_) - list_->begin());
-    } else if (rows->size() <= effort_.sortedRows) {
+        walk_.reset();
+    } else if (rows->size() <= effort_.readTexts) {
         sort(*rows);
     } else {
-        chosen_ = std::move(rows);
+        chosen_ = std::move(rows); // the first of many are soon met on the way
     }
-    if (list_)
-        walk_.reset();
 }
 
 std::optional<RowSet> RowSearch::selectedRows()
@@ -188,4 +192,5 @@ void RowSearch::sort(const RowSet& rows)
     for (const OrderKey& key : keys)
         list_->push_back(key.file());
     listed_ = static_cast<std::size_t>(given_);
+    walk_.reset();
 }

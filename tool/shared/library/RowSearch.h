@@ -10,7 +10,8 @@
 
 /// There are two ways, which give the same rows. The first goes along an index in the order that is wanted and looks at
 /// each row, which is soon done if much is found. After a number of rows that are not wanted, the second takes the rows
-/// of single conditions from their indexes, keeps those that are in all, and looks at these only.
+/// of single conditions from their indexes, keeps those that are in all, and looks at these only: as they come along
+/// the order for some time, and then, unless they are a great many, all of them, which are sorted.
 ///
 /// With the order of relevance, rows come in their own order, each with its relevance. Must not outlive the database.
 class RowSearch {
@@ -30,6 +31,7 @@ private:
         std::size_t rowsAtFirst, textsAtFirst; // to look at in the first way; texts cost several times as much
         std::size_t fewRows;                   // to take from an index without asking what others have
         std::size_t sortedRows;                // to look at and sort
+        std::size_t passedOver;                // on the way along the order, before what is left is sorted
         std::size_t readTexts;                 // to read rather than look up
     };
 
@@ -56,6 +58,7 @@ private:
     std::int64_t given_ = 0, lookedAt_ = 0, last_ = 0;
     std::optional<int> relevance_; // of the last
     bool isSettled_ = false;
+    std::size_t passedOver_ = 0;
     std::optional<RowSet> chosen_;                  // no other row is wanted
     std::optional<std::vector<std::int64_t>> list_; // what comes, instead of a walk
     std::size_t listed_ = 0;

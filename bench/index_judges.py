@@ -158,7 +158,7 @@ def by_ktfiles(text):
     for line in map(json.loads, text.splitlines()):
         if "state" in line:
             yield common(line["path"], duration=line.get("durationSeconds"), rate=line.get("sampleRate"), channels=line.get("channels"),
-                         bits=line.get("bitsPerSample"), **{key: line.get(key) for key in ("title", "artist", "album", "genre", "comment", "tempo")})
+                         bits=line.get("bitsPerSample") or line.get("sourceBits"), **{key: line.get(key) for key in ("title", "artist", "album", "genre", "comment", "tempo")})
 
 
 def by_exiftool(text):
@@ -252,8 +252,7 @@ JUDGED = {
     ("mediainfo", "rate", "opus"): "the index, as beside exiftool",
     ("exiftool", "channels", "m4a"): "the index: the sample entry of AAC says 2 always, the configuration of the decoder says how many there are",
     ("mutagen", "channels", "m4a"): "the index, as beside exiftool",
-    **{(program, "no bits", suffix): "a matter of words: the index has bits of linear PCM only; lossless sound has as many when it is decoded"
-       for program in ("exiftool", "mediainfo", "mutagen") for suffix in ("flac", "wv", "m4a")},
+    **{(program, "no bits", "m4a"): "the index: AAC has no bits; the sample entry says 16 always" for program in ("exiftool", "mutagen")},
 }
 
 

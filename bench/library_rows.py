@@ -28,7 +28,7 @@ ADJECTIVES = ["Warm", "Dirty", "Deep", "Bright", "Slow", "Soft", "Hard", "Sunny"
 FORMATS = [("WAVE", "WAVE", "PCM", ".wav", 62), ("AIFF", "AIFF", "PCM", ".aif", 14), ("CAF", "caff", "AAC-LC", ".caf", 10),
            ("MP3", "MPG3", "MP3", ".mp3", 9), ("FLAC", "flac", "FLAC", ".flac", 4), ("RF64", "WAVE", "PCM", ".wav", 1)]
 PROBLEMS = ["soundIsCut", "containerIsCut", "chunkIsCut", "padIsMissing", "bytesBehind", "unreadable"]
-COLUMNS = ("id folder name size modified indexed state kind container_name file_type coding sample_rate bits_per_sample floating_point channels "
+COLUMNS = ("id folder name size modified indexed state kind container_name file_type coding sample_rate bits_per_sample source_bits floating_point channels "
            "frames duration_seconds tempo tempo_source beat_count key_note mode key key_source signature category sub_category genre "
            "descriptors title artist album comment recorded sound_hash").split()
 START = 1_700_000_000

@@ -24,7 +24,7 @@ def whole_record():
     """Every key, and values that are lost where numbers or texts are taken for less than they are."""
     return {"path": "/m/Ä \U0010ffe4\u202e\"\\.wav", "stamp": {"size": 2**53 + 1, "modified": -(2**63), "changed": 2**63 - 1, "inode": -1},
             "indexed": 1_700_000_002, "state": "damaged", "kind": "loop", "containerName": "WAVE", "fileType": "WAVE", "coding": "PCM",
-            "sampleRate": 44100, "bitsPerSample": 24, "floatingPoint": False, "channels": 2, "channelLayout": "stereo",
+            "sampleRate": 44100, "bitsPerSample": 24, "sourceBits": 20, "floatingPoint": False, "channels": 2, "channelLayout": "stereo",
             "frames": 2**59 + 1, "durationSeconds": 0.1 + 0.2, "bitRate": 128000, "tempo": 120, "tempoSource": "acid", "beatCount": 8,
             "keyNote": 0, "mode": "neither", "key": "C", "keySource": "acid", "signature": "7/8", "category": "Bass", "subCategory": "Synth",
             "genre": "Dub\u2028", "descriptors": ["a", "b", ""], "title": "\0\x7f\ufffd", "artist": "\U0001d11e", "album": "x" * 300, "comment": "a\nb\r\t",

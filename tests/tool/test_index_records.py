@@ -121,7 +121,7 @@ class IndexRecords(CommandTest):
         if "error" in info:
             self.assertEqual((record["state"], record["problems"]), ("unreadable", [{"kind": "unreadable", "text": info["error"]}]))
             return
-        for key in ("containerName", "fileType", "coding", "sampleRate", "bitsPerSample", "floatingPoint", "channels",
+        for key in ("containerName", "fileType", "coding", "sampleRate", "bitsPerSample", "sourceBits", "floatingPoint", "channels",
                     "channelLayout", "frames", "durationSeconds", "bitRate"):
             self.assertEqual(record.get(key), info.get(key), key)
         problems = [(problem["kind"], problem["text"]) for problem in check["findings"]]

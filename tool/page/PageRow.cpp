@@ -64,6 +64,8 @@ std::string detailOf(const LibraryRecord& record)
         text = fmt::format("{}-bit{}", *record.bitsPerSample, record.floatingPoint.value_or(0) != 0 ? " float" : "");
     else if (record.coding != record.containerName)
         text = record.coding;
+    if (record.coding != "PCM" && record.sourceBits)
+        text += fmt::format("{}{}-bit", text.empty() ? "" : " ", *record.sourceBits);
     if (record.sampleRate)
         text += fmt::format("{}{:.4g}k", text.empty() ? "" : " ", *record.sampleRate / 1000);
     return text;

@@ -14,6 +14,7 @@ void addSound(LibraryRecord& record, const AudioFileInfo& info)
     if (info.exactSampleRate > 0)
         record.durationSeconds = durationOf(info);
     record.bitsPerSample = positive(std::int64_t{info.bitsPerSample});
+    record.sourceBits = positive(std::int64_t{info.sourceBits});
     if (!info.compressed)
         record.floatingPoint = info.floatingPoint ? 1 : 0;
     record.channels = info.channels;

@@ -11,6 +11,7 @@ std::span<const LibraryColumn> libraryColumns()
         {"coding", "coding", &R::coding},
         {"sample_rate", "sampleRate", &R::sampleRate},
         {"bits_per_sample", "bitsPerSample", &R::bitsPerSample},
+        {"source_bits", "sourceBits", &R::sourceBits},
         {"floating_point", "floatingPoint", &R::floatingPoint},
         {"channels", "channels", &R::channels},
         {"channel_layout", "channelLayout", &R::channelLayout},

@@ -58,7 +58,8 @@ struct LibraryRecord {
     Text fileType;      // "WAVE", "AIFF", "MPG3"
     Text coding;        // "PCM", "AAC LC"
     Real sampleRate;    // in Hz
-    Whole bitsPerSample;
+    Whole bitsPerSample; // of linear PCM
+    Whole sourceBits;    // bits of a sample that count; of lossless codings those of the original
     Whole floatingPoint; // 1: samples are floats
     Whole channels;
     Text channelLayout;

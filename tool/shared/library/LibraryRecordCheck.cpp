@@ -60,6 +60,7 @@ void requireNumbers(const LibraryRecord& record)
     requireThat(record.indexed >= 0 && record.indexed <= std::time(nullptr) + kSecondsOfDay, "indexed");
     requireRange<double>(record.sampleRate, "sampleRate", 0, mostReal);
     requireRange<std::int64_t>(record.bitsPerSample, "bitsPerSample", 0, 1024);
+    requireRange<std::int64_t>(record.sourceBits, "sourceBits", 1, 1024);
     requireRange<std::int64_t>(record.floatingPoint, "floatingPoint", 0, 1);
     requireRange<std::int64_t>(record.channels, "channels", 0, UINT32_MAX);
     requireRange<std::int64_t>(record.frames, "frames", 0, most);

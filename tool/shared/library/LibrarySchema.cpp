@@ -38,7 +38,8 @@ CREATE TABLE files(
     file_type TEXT,
     coding TEXT,
     sample_rate REAL,             -- in Hz
-    bits_per_sample INTEGER,
+    bits_per_sample INTEGER,      -- of linear PCM
+    source_bits INTEGER,          -- bits of a sample that count; of lossless codings those of the original
     floating_point INTEGER,       -- 1: samples are floats
     channels INTEGER,
     channel_layout TEXT,

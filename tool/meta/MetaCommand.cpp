@@ -1,12 +1,12 @@
 #include "tool/meta/MetaCommand.h"
 
 #include "audiofile/fields/FileMetadata.h"
-#include "tool/shared/metadata/MetaFile.h"
 #include "tool/meta/MetaText.h"
 #include "tool/shared/access/FileAccess.h"
 #include "tool/shared/arguments/CommandLine.h"
 #include "tool/shared/arguments/ThreadsOption.h"
 #include "tool/shared/input/FileByFile.h"
+#include "tool/shared/metadata/MetaFile.h"
 #include "tool/shared/output/DataRecords.h"
 
 #include <algorithm>

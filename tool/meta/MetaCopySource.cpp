@@ -1,8 +1,8 @@
 #include "tool/meta/MetaCopySource.h"
 
 #include "media/containers/ContainerHeaders.h"
-#include "tool/shared/metadata/MetaFile.h"
 #include "tool/shared/input/InputFile.h"
+#include "tool/shared/metadata/MetaFile.h"
 #include "tool/shared/output/Failure.h"
 #include "tool/shared/portable/PortableMarkers.h"
 

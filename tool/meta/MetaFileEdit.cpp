@@ -4,10 +4,10 @@
 #include "media/containers/ContainerHeaders.h"
 #include "media/userdata/AudioFileService.h"
 #include "platform/core/Status.h"
-#include "tool/shared/metadata/MetaFile.h"
 #include "tool/shared/edits/EditProblems.h"
 #include "tool/shared/input/FileLocation.h"
 #include "tool/shared/input/InputFile.h"
+#include "tool/shared/metadata/MetaFile.h"
 #include "tool/shared/output/Failure.h"
 
 #include <fmt/format.h>

@@ -1,11 +1,11 @@
 // ktfiles meta import: sets the fields of many files from one table.
 #include "tool/meta/MetaCommand.h"
 #include "tool/meta/MetaEdits.h"
-#include "tool/shared/metadata/MetaFile.h"
 #include "tool/meta/MetaTable.h"
 #include "tool/shared/access/FileAccess.h"
 #include "tool/shared/arguments/CommandLine.h"
 #include "tool/shared/edits/EndingSignals.h"
+#include "tool/shared/metadata/MetaFile.h"
 #include "tool/shared/output/Failure.h"
 #include "tool/shared/output/FilesProgress.h"
 #include "tool/shared/output/JsonRecords.h"

@@ -2,8 +2,8 @@
 #pragma once
 
 #include "platform/core/KTMem.h"
-#include "tool/shared/waveform/WaveformOutline.h"
 #include "tool/shared/input/SoundReader.h"
+#include "tool/shared/waveform/WaveformOutline.h"
 
 #include <memory>
 #include <string>

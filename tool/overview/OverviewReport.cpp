@@ -1,11 +1,11 @@
 #include "tool/overview/OverviewReport.h"
 
-#include "tool/shared/waveform/Sparkline.h"
 #include "tool/shared/input/FolderWalk.h"
 #include "tool/shared/output/ClockTime.h"
 #include "tool/shared/output/DisplayWidth.h"
 #include "tool/shared/output/ShownName.h"
 #include "tool/shared/output/Terminal.h"
+#include "tool/shared/waveform/Sparkline.h"
 
 #include <algorithm>
 

@@ -52,12 +52,12 @@ struct LibraryRecord {
     std::int64_t indexed = 0; // when it was read, in seconds since 1970
 
     // What it is, as `info` says it.
-    Text state;         // "whole", "damaged": there is less than its headers promise, or it has problems; "unreadable"
-    Text kind;          // "loop", "one-shot", "recording"
-    Text containerName; // "WAVE", "AIFF", "MP3"
-    Text fileType;      // "WAVE", "AIFF", "MPG3"
-    Text coding;        // "PCM", "AAC LC"
-    Real sampleRate;    // in Hz
+    Text state;          // "whole", "damaged": there is less than its headers promise, or it has problems; "unreadable"
+    Text kind;           // "loop", "one-shot", "recording"
+    Text containerName;  // "WAVE", "AIFF", "MP3"
+    Text fileType;       // "WAVE", "AIFF", "MPG3"
+    Text coding;         // "PCM", "AAC LC"
+    Real sampleRate;     // in Hz
     Whole bitsPerSample; // of linear PCM
     Whole sourceBits;    // bits of a sample that count; of lossless codings those of the original
     Whole floatingPoint; // 1: samples are floats

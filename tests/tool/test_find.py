@@ -276,7 +276,7 @@ class Typed(CommandTest):
             ("--format", {"wav": "IS", "WAV": "IS", "rf64": "I", "aiff": "B", "aifc": "B", "mp3": ""}),
             ("--problem", {"truncated": "I", "any": "I", "soundiscut": "I", "unreadable": ""}),
             ("--category", {"bass": "B", "BASS": "B"}), ("--artist", {"bjork ost": "B", "Björk": ""}), ("--kind", {"loops": "BS", "one-shot": ""}),
-            ("--since", {"yesterday": "S", "today": "", "25h": "S", "2d": "S", "60h": "BS", "1w": "BIS", "2001-01-01": "BIS", "2100-01-01T00:00:00Z": ""}),
+            ("--since", {"yesterday": "S", "today": "", "25h": "S", "47h": "S", "60h": "BS", "1w": "BIS", "2001-01-01": "BIS", "2100-01-01T00:00:00Z": ""}),
         ]
         for option, values in cases:
             for value, expected in values.items():

@@ -116,6 +116,14 @@ class Index(IndexTest):
         self.assertEqual(self.rows(), rows)
         self.assertEqual(self.query("SELECT name, sample_rate FROM files ORDER BY name"), [("a.wav", 22050), ("b.wav", 22050), ("c.wav", 48000)])
 
+    def test_an_index_with_hashes_keeps_them_of_files_that_change(self):
+        self.make("lib/a.wav", "lib/b.wav")
+        self.index("lib", "--hash")
+        hashes = dict(self.query("SELECT name, sound_hash FROM files"))
+        (self.folder / "lib/a.wav").write_bytes((self.folder / "lib/b.wav").read_bytes())
+        self.assertEqual(self.index("lib")["changed"], 1)
+        self.assertEqual(dict(self.query("SELECT name, sound_hash FROM files")), {"a.wav": hashes["b.wav"], "b.wav": hashes["b.wav"]})
+
     def test_what_is_not_there_is_kept_or_removed(self):
         self.make("lib/a.wav", "lib/deep/b.wav", "more/c.wav")
         self.index("lib", "more")

@@ -25,6 +25,14 @@ constexpr std::size_t kMostPending = 4'000;
 constexpr unsigned kWalkers = 2, kNetworkWalkers = 16;
 constexpr std::chrono::milliseconds kLookAround{20};
 
+// An index that has hashes keeps them of files that change.
+LibraryReading settledReading(Library& library, LibraryReading reading)
+{
+    const char* const anyHash = "SELECT EXISTS (SELECT 1 FROM files WHERE sound_hash IS NOT NULL)";
+    reading.hash = reading.hash || library.database().number(anyHash) != 0;
+    return reading;
+}
+
 class LibraryUpdating {
 public:
     LibraryUpdating(Library& library, const LibraryUpdate& update);
@@ -72,7 +80,7 @@ LibraryUpdating::LibraryUpdating(Library& library, const LibraryUpdate& update)
       known_(library.database()),
       batch_(library, changes_),
       knowsAudio_(library.database().number("SELECT EXISTS (SELECT 1 FROM files)") != 0),
-      pool_(inbox_, update.reading, update.threads)
+      pool_(inbox_, settledReading(library, update.reading), update.threads)
 {
 }
 

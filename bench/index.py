@@ -57,7 +57,8 @@ def latency(ktfiles, folder, files=1500):
     make(folder / "lib", files, 2000)
     shim, report = folder / "slow_storage.so", folder / "report"
     subprocess.run(["cc", "-O2", "-shared", "-fPIC", "-o", shim, BENCH / "slow_storage.c", "-ldl"], check=True)
-    slow = {"LD_PRELOAD": str(shim), "SLOW_FOLDER": str(folder / "lib"), "SLOW_REPORT": str(report)}
+    slow = {"LD_PRELOAD": str(shim), "SLOW_FOLDER": f"{folder}/lib/",  # and not the database beside it
+            "SLOW_REPORT": str(report)}
 
     def index(*options):
         for path in folder.glob("library.db*"):

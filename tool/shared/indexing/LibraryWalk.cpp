@@ -5,7 +5,6 @@
 #include <algorithm>
 #include <cstdlib>
 #include <memory>
-#include <ranges>
 
 namespace {
 
@@ -23,7 +22,7 @@ LibraryWalk::LibraryWalk(UpdateInbox& inbox, std::vector<WalkStart> starts, unsi
     : inbox_(inbox),
       opened_(std::move(opened))
 {
-    for (WalkStart& start : starts | std::views::reverse) {
+    for (WalkStart& start : starts) {
         FolderListing listing;
         listing.path = start.path;
         listing.words = start.words;
@@ -34,6 +33,7 @@ LibraryWalk::LibraryWalk(UpdateInbox& inbox, std::vector<WalkStart> starts, unsi
             roots_.push_back(start.path.substr(0, start.path.size() - below.size()));
         tasks_.push_back({std::move(listing), std::move(start.files), start.isAlone});
     }
+    std::ranges::reverse(tasks_);
     if (tasks_.empty()) {
         inbox_.endListings();
         return;
@@ -104,7 +104,7 @@ bool LibraryWalk::visit(Task& task)
 void LibraryWalk::addFolders(const FolderListing& listing)
 {
     std::vector<Task> tasks;
-    for (const ListedFolder& folder : listing.folders | std::views::reverse) {
+    for (const ListedFolder& folder : listing.folders) {
         FolderListing next;
         next.path = listing.path + folder.name + "/";
         next.words = listing.words + folder.name + "/";
@@ -119,7 +119,7 @@ void LibraryWalk::addFolders(const FolderListing& listing)
     if (tasks.empty())
         return;
     const std::lock_guard lock(mutex_);
-    tasks_.insert(tasks_.end(), std::make_move_iterator(tasks.begin()), std::make_move_iterator(tasks.end()));
+    tasks_.insert(tasks_.end(), std::make_move_iterator(tasks.rbegin()), std::make_move_iterator(tasks.rend()));
     ready_.notify_all();
 }
 

@@ -34,6 +34,18 @@ def without_what_varies(line):
     return re.sub(r" +\d{2,7}\b(?=  ktfiles)", " PID", re.sub(r"\b\d{4}-\d\d-\d\dT\d\d:\d\d:\d\dZ", "DATE", line))
 
 
+def screen(text):
+    """What is to be seen at the end of all that a terminal got: lines of progress are drawn over, and cleared."""
+    lines = []
+    for line in text.replace("\r\n", "\n").split("\n"):
+        seen = ""
+        for part in line.split("\r"):
+            kept, *more = part.split("\x1b[K")
+            seen = kept + ("" if more else seen[len(kept):]) + "".join(more)
+        lines.append(seen)
+    return "\n".join(lines)
+
+
 class TypedTest(CommandTest):
     def setUp(self):
         super().setUp()
@@ -58,7 +70,7 @@ class TypedTest(CommandTest):
             except OSError:  # EIO: the other side is gone
                 pass
         os.close(ours)
-        return text.decode().replace("\r\n", "\n").splitlines()
+        return screen(text.decode()).splitlines()
 
     def assert_shows(self, name, text):
         """That each console block of the document, typed in order, shows what it says."""

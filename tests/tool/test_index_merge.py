@@ -177,6 +177,8 @@ class MergeTest(CommandTest):
             with self.subTest(name):
                 self.assertIn(words, self.merge(name, status=1).stderr.decode())
         self.assertEqual(list(self.files()), ["/m/a.wav"])
+        self.merge("absent", "folder", db="none.db", status=1)
+        self.assertFalse((self.folder / "none.db").exists())
 
     def test_a_database_with_strange_rows_is_refused_at_these(self):
         for name, change in (("relative", "UPDATE folders SET path = 'm/', words = 'm/'"), ("dots", "UPDATE seen SET name = '..'"),

@@ -16,6 +16,7 @@
 #include <fmt/format.h>
 
 #include <algorithm>
+#include <optional>
 #include <sys/stat.h>
 
 namespace {
@@ -68,12 +69,11 @@ public:
     SourceMerge(Library& target, FilesProgress& progress) : target_(target), merge_(target), progress_(progress) {}
 
     /// Throws Failure; what came before stays.
-    void add(const std::string& source)
+    void add(const std::string& source, InputLines& lines, bool isDatabase)
     {
         progress_.begin(source);
-        InputLines lines(source);
         requireOther(lines.descriptor());
-        if (source != kStandardInput && lines.beginsWith(kDatabaseBeginning))
+        if (isDatabase)
             addDatabase(source);
         else
             addLines(lines);
@@ -191,41 +191,75 @@ private:
     JsonRecords json_;
 };
 
-// False for a source that failed; an index that cannot be written ends it all.
-bool mergeSources(const MergeArguments& arguments, Library& target, MergeReport& report, bool quiet)
-{
-    FilesProgress progress("merging", quiet);
-    SourceMerge merge(target, progress);
-    bool isGood = true;
-    for (const std::string& source : arguments.sources) {
-        const MergeCounts before = merge.counts();
+class MergeRun {
+public:
+    MergeRun(const MergeArguments& arguments, const OutputOptions& options)
+        : arguments_(arguments),
+          path_(arguments.database.empty() ? defaultLibrary() : arguments.database),
+          progress_("merging", options.quiet),
+          report_(options)
+    {
+    }
+
+    /// False for a source that failed. An index that cannot be written ends it all.
+    bool run()
+    {
         try {
-            merge.add(source);
-            report.add(source, merge.counts() - before);
+            for (const std::string& source : arguments_.sources)
+                open(source);
         } catch (const Failure& failure) {
-            merge.abandon();
-            report.addFailure(source, failure.what());
-            isGood = false;
+            fail(path_, failure.what());
+        }
+        report_.finish();
+        return isGood_;
+    }
+
+private:
+    /// The index is made for the first source that can be read, and not for none.
+    void open(const std::string& source)
+    {
+        std::optional<InputLines> lines;
+        bool isDatabase = false;
+        try {
+            lines.emplace(source);
+            isDatabase = lines->beginsWith(kDatabaseBeginning) && source != kStandardInput;
+        } catch (const Failure& failure) {
+            return fail(source, failure.what());
+        }
+        if (!merge_) {
+            target_.emplace(path_, SQLDatabase::Mode::create);
+            target_->database().run(kCheckpoints);
+            merge_.emplace(*target_, progress_);
+        }
+        add(source, *lines, isDatabase);
+    }
+
+    void add(const std::string& source, InputLines& lines, bool isDatabase)
+    {
+        const MergeCounts before = merge_->counts();
+        try {
+            merge_->add(source, lines, isDatabase);
+            report_.add(source, merge_->counts() - before);
+        } catch (const Failure& failure) {
+            merge_->abandon();
+            fail(source, failure.what());
         }
     }
-    return isGood;
-}
 
-bool runMerge(const MergeArguments& arguments, const OutputOptions& options)
-{
-    const std::string path = arguments.database.empty() ? defaultLibrary() : arguments.database;
-    MergeReport report(options);
-    bool isGood = false;
-    try {
-        Library target(path, SQLDatabase::Mode::create);
-        target.database().run(kCheckpoints);
-        isGood = mergeSources(arguments, target, report, options.quiet);
-    } catch (const Failure& failure) {
-        report.addFailure(path, failure.what());
+    void fail(const std::string& name, const std::string& problem)
+    {
+        report_.addFailure(name, problem);
+        isGood_ = false;
     }
-    report.finish();
-    return isGood;
-}
+
+    const MergeArguments& arguments_;
+    std::string path_;
+    FilesProgress progress_;
+    MergeReport report_;
+    bool isGood_ = true;
+    std::optional<Library> target_;
+    std::optional<SourceMerge> merge_;
+};
 
 } // namespace
 
@@ -234,7 +268,7 @@ void declareIndexMerge(CommandLine& commandLine, Verb& index)
     static MergeArguments arguments;
     Verb& verb = commandLine.addVerb(
         "merge", "Bring indexes, or their records as JSON Lines, into one",
-        [&commandLine] { return runMerge(arguments, commandLine.output()); }, &index);
+        [&commandLine] { return MergeRun(arguments, commandLine.output()).run(); }, &index);
     verb.addTexts("SOURCE", arguments.sources, "Indexes, and files of JSON Lines; \"-\" is standard input").required();
     verb.addText("--db", arguments.database, "The index that they go into, in place of your own").label("FILE");
 }

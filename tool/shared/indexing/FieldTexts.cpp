@@ -4,7 +4,7 @@
 #include "platform/core/JsonWriter.h"
 #include "platform/core/UTF8.h"
 #include "tool/shared/indexing/BoundedText.h"
-#include "tool/shared/indexing/KeyText.h"
+#include "tool/shared/library/KeyText.h"
 #include "tool/shared/library/LibraryRecord.h"
 
 #include <algorithm>

@@ -3,7 +3,7 @@
 #include "loops/VireoLoopTerms.h"
 #include "platform/core/JsonWriter.h"
 #include "tool/shared/indexing/BoundedText.h"
-#include "tool/shared/indexing/KeyText.h"
+#include "tool/shared/library/KeyText.h"
 #include "tool/shared/library/LibraryRecord.h"
 #include "tool/shared/looptags/LoopTagWords.h"
 #include "tool/shared/output/Record.h"

@@ -1,7 +1,7 @@
 #include "tool/shared/library/QueryValues.h"
 
 #include "platform/core/ASCIICase.h"
-#include "tool/shared/indexing/KeyText.h"
+#include "tool/shared/library/KeyText.h"
 #include "tool/shared/output/ClockTime.h"
 
 #include <algorithm>

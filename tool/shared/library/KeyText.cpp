@@ -1,4 +1,4 @@
-#include "tool/shared/indexing/KeyText.h"
+#include "tool/shared/library/KeyText.h"
 
 #include "loops/tags/LoopTagFields.h"
 #include "platform/core/ASCIICase.h"

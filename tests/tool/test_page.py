@@ -1,5 +1,6 @@
 """The page of a library: what ktfiles page writes and serves, in a real browser."""
 import base64
+import contextlib
 import http.client
 import json
 import math
@@ -7,6 +8,7 @@ import os
 import pathlib
 import random
 import re
+import resource
 import shutil
 import signal
 import socket
@@ -17,6 +19,7 @@ import unittest
 import urllib.parse
 
 from command import KTFILES, MEDIA, CommandTest
+from test_failing_calls import TRACES
 from test_overview import pcm
 
 ROOT = pathlib.Path(__file__).resolve().parents[2]
@@ -518,11 +521,13 @@ class Playing(Browsing):
 
 
 class Served(PageTest):
-    def serve(self, *options):
-        process = subprocess.Popen([KTFILES, "page", "--serve", "--db", "l.db", *options], cwd=self.folder, stdout=subprocess.PIPE, text=True)
+    def serve(self, *options, under=(), **more):
+        process = subprocess.Popen([*under, KTFILES, "page", "--serve", "--db", "l.db", *options], cwd=self.folder, stdout=subprocess.PIPE, text=True,
+                                   start_new_session=True, **more)
 
         def end():
-            process.kill()
+            with contextlib.suppress(ProcessLookupError):
+                os.killpg(process.pid, signal.SIGKILL)
             process.wait()
             process.stdout.close()
         self.addCleanup(end)
@@ -631,6 +636,25 @@ class Served(PageTest):
         for connection in held:
             connection.close()
 
+    def test_ranges_without_end_do_not_exhaust_a_small_stack(self):
+        self.add("a.wav", loop())
+        self.index()
+        self.serve(preexec_fn=lambda: resource.setrlimit(resource.RLIMIT_STACK, (1 << 20, 1 << 20)))
+        self.assertEqual(self.ask("/", Range="bytes=" + ",".join(["0-0"] * 2000))[0], 403)
+        self.assertEqual(self.ask(self.path + "file/0")[0], 200)
+
+    @unittest.skipUnless(TRACES, "strace cannot trace here")
+    def test_fewer_threads_than_wished_for(self):
+        self.add("a.wav", loop())
+        self.index()
+        after = ["strace", "-f", "-qq", "-o", "/dev/null", "-e", "trace=clone,clone3", "-e"]
+        self.serve(under=[*after, "inject=clone,clone3:error=EAGAIN:when=3+"])
+        self.assertEqual(self.ask(self.path + "file/0")[0], 200)
+        none = subprocess.run([*after, "inject=clone,clone3:error=EAGAIN", KTFILES, "page", "--serve", "--db", "l.db"], cwd=self.folder,
+                              capture_output=True, text=True, timeout=60)
+        self.assertEqual((none.returncode, none.stdout), (1, ""))
+        self.assertIn("no thread can be started", none.stderr)
+
     def test_a_port_of_choice_and_one_that_is_taken(self):
         self.add("a.wav", loop())
         self.index()
@@ -644,6 +668,7 @@ class ServedInBrowser(Browsing, Served):
     test_nothing_without_the_token_and_nothing_but_the_rows = test_ranges = None
     test_a_file_that_is_swapped_is_not_given_out = test_what_is_decoded_is_the_sound_from_anywhere = None
     test_it_ends_at_once_while_a_browser_holds_connections = test_a_port_of_choice_and_one_that_is_taken = None
+    test_ranges_without_end_do_not_exhaust_a_small_stack = test_fewer_threads_than_wished_for = None
 
     def test_all_sounds_play(self):
         self.add("a <b>.wav", loop(4))

@@ -10,7 +10,8 @@ target_sources(ktfiles PRIVATE ${page_sources})
 
 # The server, which the command loads when it is asked to serve a page.
 if(KTFILES_WITH_SERVER)
-    add_library(ktfiles_server MODULE ${CMAKE_CURRENT_LIST_DIR}/server/HttpServer.cpp)
+    file(GLOB server_sources CONFIGURE_DEPENDS ${CMAKE_CURRENT_LIST_DIR}/server/*.cpp)
+    add_library(ktfiles_server MODULE ${server_sources})
     target_include_directories(ktfiles_server PRIVATE ${PROJECT_SOURCE_DIR})
     target_link_libraries(ktfiles_server PRIVATE ktfiles_options ktfiles_headers PkgConfig::httplib Threads::Threads)
     target_link_options(ktfiles_server PRIVATE -Wl,--as-needed)

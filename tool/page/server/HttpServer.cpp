@@ -2,11 +2,13 @@
 // business.
 #include "platform/core/Export.h"
 #include "tool/page/ServerModule.h"
+#include "tool/page/server/ServingThreads.h"
 
 #include <httplib.h>
 
 #include <algorithm>
 #include <exception>
+#include <memory>
 #include <string>
 
 namespace {
@@ -72,8 +74,9 @@ void send(const httplib::Request& request, httplib::Response& response, const st
 
 bool serve(ServedSite& site, int port, const std::function<bool(int)>& begin)
 {
+    auto threads = std::make_unique<ServingThreads>(kThreads);
     httplib::Server server;
-    server.new_task_queue = [] { return new httplib::ThreadPool(kThreads); }; // the server owns it
+    server.new_task_queue = [&threads] { return threads.release(); }; // the server owns them
     // The default would let another process of the same user open the same port.
     server.set_socket_options([](socket_t socket) {
         const int yes = 1;

@@ -85,7 +85,8 @@ class MergeTest(CommandTest):
         good, bad = line("/m/good.wav"), lambda **more: line("/m/bad.wav", **more)
         points = lambda count: base64.b64encode(b"\0" * count).decode()  # noqa: E731
         table = {
-            "cut": bad()[:-5], "no object": "[1]", "a text": '"x"', "no path": "{}", "two": bad() + bad(), "not UTF-8": bad().encode() + b"\xff",
+            "cut": bad()[:-5], "no object": "[1]", "a text": '"x"', "no path": "{}", "two": bad() + bad(), "a NUL behind it": bad() + "\0", "more behind a NUL": bad() + '\0"',
+            "not UTF-8": bad().encode() + b"\xff",
             "a key twice": bad()[:-1] + ', "indexed": 7}', "an escaped key": bad()[:-1] + ', "f\\u0069elds": []}', "an unknown key": bad(colour="red"),
             "a relative path": line("m/bad.wav"), "dots": line("/m/../bad.wav"), "a dot": line("/m/./bad.wav"), "two slashes": line("/m//bad.wav"),
             "a folder": line("/m/bad/"), "only dots": line("/m/.."), "a NUL": line("/m/b\0d"), "no name": line("/"), "long": line("/m/" + "x" * 2000),

@@ -188,7 +188,8 @@ class JsonMembers {
 public:
     explicit JsonMembers(std::string_view text) : json_(JsonTree::parse(text, nullptr, false))
     {
-        if (!json_.is_object())
+        // The parser takes a zero byte for the end, and has not looked at what follows.
+        if (!json_.is_object() || text.find('\0') != text.npos)
             throw Failure("is no JSON object");
         for (const auto& [key, value] : membersAsWritten(text))
             if (!json_.contains(key) || !written_.emplace(std::string(key), value).second)

@@ -116,6 +116,18 @@ class Index(IndexTest):
         self.assertEqual(self.rows(), rows)
         self.assertEqual(self.query("SELECT name, sample_rate FROM files ORDER BY name"), [("a.wav", 22050), ("b.wav", 22050), ("c.wav", 48000)])
 
+    @unittest.skipUnless(TRACES, "strace cannot trace here")
+    def test_files_on_a_memory_stick_are_the_same_when_it_is_plugged_in_again(self):
+        """On FAT inodes are made up while it is mounted."""
+        self.make("lib/a.wav", "lib/b.wav")
+        self.index("lib")
+        with sqlite3.connect(self.folder / "library.db") as database:
+            database.execute("UPDATE seen SET inode = inode + 7")
+        fat = ["strace", "-f", "-o", "log", "-e", "trace=statfs", "-e", "inject=statfs:poke_exit=@arg2=444d000000000000"]
+        told = subprocess.run([*fat, KTFILES, "index", "lib", "--db", "library.db", "--jsonl"], cwd=self.folder, check=True, capture_output=True)
+        self.assertEqual(json.loads(told.stdout)["counts"]["unchanged"], 2)
+        self.assertEqual(self.index("lib"), self.changes(changed=2))
+
     def test_an_index_with_hashes_keeps_them_of_files_that_change(self):
         self.make("lib/a.wav", "lib/b.wav")
         self.index("lib", "--hash")

@@ -178,6 +178,17 @@ void LibraryUpdating::compare(FolderListing found)
             noteVanished(folder->path, *row);
         ++row;
     };
+    std::optional<bool> areInodesLasting;
+    const auto isSame = [&](SeenStamp before, const SeenStamp& now) {
+        if (before == now)
+            return true;
+        before.inode = now.inode;
+        if (before != now)
+            return false;
+        if (!areInodesLasting)
+            areInodesLasting = haveLastingInodes(folder->path);
+        return !*areInodesLasting;
+    };
     std::int64_t same = 0;
     for (std::size_t i = 0; i < folder->files.size(); ++i) {
         const ListedFile& file = folder->files[i];
@@ -189,7 +200,7 @@ void LibraryUpdating::compare(FolderListing found)
         } else if (!isKnown) {
             compareNew(folder, i);
         } else {
-            if (row->stamp == file.stamp) {
+            if (isSame(row->stamp, file.stamp)) {
                 ++(row->isAudio ? changes_.same : changes_.passedOver);
                 ++same;
             } else {

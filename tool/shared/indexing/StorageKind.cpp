@@ -28,11 +28,33 @@ constexpr std::uint32_t kNetworkKinds[] = {
     0x786f4256, // folders that a virtual machine shares
 };
 
+// Numbers of inodes are made up while the file system is mounted, or may be.
+constexpr std::uint32_t kMadeUpInodeKinds[] = {
+    0x00004d44, // FAT
+    0x2011bab0, // exFAT
+    0x65735546, // FUSE
+    0x0000517b, // SMB
+    0xff534d42, // CIFS
+    0xfe534d42, // SMB 2
+    0x786f4256, // folders that a virtual machine shares
+};
+
+template <std::size_t count>
+bool isOfKind(const std::string& folder, const std::uint32_t (&kinds)[count])
+{
+    struct statfs status = {};
+    return ::statfs(folder.c_str(), &status) == 0 &&
+           std::ranges::find(kinds, static_cast<std::uint32_t>(status.f_type)) != std::end(kinds);
+}
+
 } // namespace
 
 bool isOnNetwork(const std::string& folder)
 {
-    struct statfs status = {};
-    return ::statfs(folder.c_str(), &status) == 0 &&
-           std::ranges::find(kNetworkKinds, static_cast<std::uint32_t>(status.f_type)) != std::end(kNetworkKinds);
+    return isOfKind(folder, kNetworkKinds);
+}
+
+bool haveLastingInodes(const std::string& folder)
+{
+    return !isOfKind(folder, kMadeUpInodeKinds);
 }

@@ -312,6 +312,24 @@ class Index(IndexTest):
         self.index("lib")
         self.assertEqual(len(self.rows()), 300)
 
+    @unittest.skipIf(INSTRUMENTED, "an instrumented program reserves more memory than that")
+    def test_want_of_memory_is_told_and_ends_in_order(self):
+        (self.folder / "lib").mkdir()
+        for number in range(20_000):
+            self.write(f"lib/{number:05}{'x' * 220}", b"")
+        told = set()
+        for megabytes in range(40, 141, 10):
+            def limit(bytes=megabytes << 20):
+                resource.setrlimit(resource.RLIMIT_AS, (bytes, bytes))
+            for arguments in (["--db", "library.db"], ["--records"]):
+                result = subprocess.run([KTFILES, "index", "lib", "-j", "2", *arguments], cwd=self.folder, capture_output=True, text=True, preexec_fn=limit)
+                if result.returncode != 127:  # the system cannot load the command
+                    told.add(result.stderr.rpartition(": ")[2])
+                    self.assertEqual(result.returncode, 1 if result.stderr else 0, result.stderr)
+        self.assertIn("out of memory\n", told)
+        self.index("lib")
+        self.assert_sound()
+
     def test_a_tree_that_changes_meanwhile(self):
         self.make(*(f"lib/{number % 5}/{number}.wav" for number in range(500)))
         process = subprocess.Popen([KTFILES, "index", "lib", "--db", "library.db"], cwd=self.folder, stderr=subprocess.PIPE)
@@ -397,6 +415,7 @@ class Watch(IndexTest):
         # More than the system's queue holds.
         process.send_signal(signal.SIGSTOP)
         two = [os.open(self.folder / f"lib/{name}.txt", os.O_CREAT | os.O_WRONLY) for name in "xy"]
+        (self.folder / "lib").mkdir()
         for number in range(20_000):
             os.fchmod(two[number % 2], 0o600 + number % 3)
         list(map(os.close, two))

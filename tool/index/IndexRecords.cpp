@@ -74,8 +74,6 @@ private:
 
     void take(const FileReading& reading)
     {
-        if (reading.isOutOfMemory)
-            throw Failure("out of memory");
         if (update_.progress != nullptr) {
             update_.progress->begin(reading.job.folder->path + reading.job.listed().text);
             update_.progress->advance(1);

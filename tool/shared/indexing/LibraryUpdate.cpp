@@ -233,8 +233,6 @@ void LibraryUpdating::compareNew(const std::shared_ptr<const FolderListing>& fol
 
 void LibraryUpdating::take(FileReading reading)
 {
-    if (reading.isOutOfMemory)
-        throw Failure("out of memory");
     const ReadingJob& job = reading.job;
     if (update_.progress != nullptr) {
         update_.progress->begin(job.folder->path + job.listed().text);

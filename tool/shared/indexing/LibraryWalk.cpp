@@ -4,6 +4,7 @@
 
 #include <algorithm>
 #include <cstdlib>
+#include <exception>
 #include <memory>
 
 namespace {
@@ -58,6 +59,15 @@ LibraryWalk::~LibraryWalk()
 }
 
 void LibraryWalk::work()
+{
+    try {
+        visitAll();
+    } catch (...) {
+        inbox_.fail(std::current_exception());
+    }
+}
+
+void LibraryWalk::visitAll()
 {
     std::unique_lock lock(mutex_);
     for (;;) {

@@ -40,6 +40,7 @@ private:
     };
 
     void work();
+    void visitAll();
     bool visit(Task& task);
     void addFolders(const FolderListing& listing);
     bool isNew(const FolderListing& listing);

@@ -8,8 +8,8 @@
 #include <algorithm>
 #include <array>
 #include <ctime>
+#include <exception>
 #include <fcntl.h>
-#include <new>
 #include <unistd.h>
 
 namespace {
@@ -37,16 +37,12 @@ FileReading readJob(ReadingJob job, const LibraryReading& reading)
 {
     FileReading result;
     result.job = std::move(job);
-    try {
-        const ListedFile& file = result.job.listed();
-        const FilePlace place{result.job.folder->path, nameOfIndexed(file.text)};
-        result.record = readLibraryRecord(place, file.stamp, reading);
-        if (result.record && result.record->state == "unreadable" && !isReadable(place.path()))
-            result.record->stamp.changed = result.record->stamp.inode = 0;
-        result.isThere = result.record || stampOfFile(place.path()) == file.stamp;
-    } catch (const std::bad_alloc&) {
-        result.isOutOfMemory = true;
-    }
+    const ListedFile& file = result.job.listed();
+    const FilePlace place{result.job.folder->path, nameOfIndexed(file.text)};
+    result.record = readLibraryRecord(place, file.stamp, reading);
+    if (result.record && result.record->state == "unreadable" && !isReadable(place.path()))
+        result.record->stamp.changed = result.record->stamp.inode = 0;
+    result.isThere = result.record || stampOfFile(place.path()) == file.stamp;
     return result;
 }
 
@@ -121,6 +117,15 @@ void ReadingPool::stop()
 }
 
 void ReadingPool::work()
+{
+    try {
+        readAll();
+    } catch (...) {
+        inbox_.fail(std::current_exception());
+    }
+}
+
+void ReadingPool::readAll()
 {
     std::unique_lock lock(mutex_);
     for (;;) {

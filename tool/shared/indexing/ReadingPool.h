@@ -32,6 +32,7 @@ public:
 private:
     void startThreads(std::size_t count);
     void work();
+    void readAll();
 
     static constexpr std::size_t kMostWaiting = 32; // threads, unless the user asks for more
 

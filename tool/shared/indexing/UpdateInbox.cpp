@@ -1,5 +1,24 @@
 #include "tool/shared/indexing/UpdateInbox.h"
 
+#include "tool/shared/output/Failure.h"
+
+#include <iterator>
+#include <new>
+#include <utility>
+
+namespace {
+
+[[noreturn]] void throwAgain(const std::exception_ptr& problem)
+{
+    try {
+        std::rethrow_exception(problem);
+    } catch (const std::bad_alloc&) {
+        throw Failure("out of memory");
+    }
+}
+
+} // namespace
+
 bool UpdateInbox::leave(FolderListing listing)
 {
     std::unique_lock lock(mutex_);
@@ -31,6 +50,13 @@ void UpdateInbox::endListings()
     arrived_.notify_one();
 }
 
+void UpdateInbox::fail(std::exception_ptr problem)
+{
+    const std::lock_guard lock(mutex_);
+    problem_ = std::move(problem);
+    arrived_.notify_one();
+}
+
 void UpdateInbox::close()
 {
     const std::lock_guard lock(mutex_);
@@ -47,8 +73,11 @@ void UpdateInbox::makeBoundless()
 UpdateInbox::Contents UpdateInbox::take(bool wantsListings, std::chrono::steady_clock::time_point deadline)
 {
     std::unique_lock lock(mutex_);
-    arrived_.wait_until(lock, deadline,
-                        [&] { return !readings_.empty() || (wantsListings && (!listings_.empty() || isWalkOver_)); });
+    arrived_.wait_until(lock, deadline, [&] {
+        return problem_ || !readings_.empty() || (wantsListings && (!listings_.empty() || isWalkOver_));
+    });
+    if (problem_)
+        throwAgain(problem_);
     Contents contents;
     contents.readings = std::exchange(readings_, {});
     if (wantsListings) {

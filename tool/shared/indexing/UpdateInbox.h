@@ -6,6 +6,7 @@
 #include <chrono>
 #include <condition_variable>
 #include <deque>
+#include <exception>
 #include <memory>
 #include <mutex>
 #include <optional>
@@ -25,7 +26,6 @@ struct FileReading {
     ReadingJob job;
     std::optional<LibraryRecord> record;
     bool isThere = false; // as it was listed; otherwise it has changed since, or is gone
-    bool isOutOfMemory = false;
 };
 
 /// Any thread may leave something; one takes.
@@ -37,6 +37,8 @@ public:
     bool leave(FileReading reading);
     /// No listing will follow.
     void endListings();
+    /// The work cannot go on: call where an exception would leave a thread. The next `take` throws it.
+    void fail(std::exception_ptr problem);
     /// Lets those that wait for room go, for good.
     void close();
     /// There is always room from now on, for a thread that leaves something and takes it itself.
@@ -48,7 +50,7 @@ public:
         bool isWalkOver = false; // and no listing is left
     };
     /// All that is there; waits until `deadline` if there is nothing. Listings stay where they are unless they are
-    /// wanted.
+    /// wanted. Throws what a thread has failed with; a want of memory is a Failure.
     Contents take(bool wantsListings, std::chrono::steady_clock::time_point deadline);
 
 private:
@@ -60,6 +62,7 @@ private:
     std::deque<FolderListing> listings_;
     std::vector<FileReading> readings_;
     std::size_t files_ = 0; // in the listings
+    std::exception_ptr problem_;
     bool isWalkOver_ = false;
     bool isClosed_ = false;
     bool isBoundless_ = false;

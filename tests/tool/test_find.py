@@ -204,6 +204,14 @@ class AgainstAPlainFilter(CommandTest):
             asked = {"keys": keys, "tempos": [(119.5, 120.5), (59.75, 60.25), (239, 241)]}
             self.assertEqual(self.found("--key", key, "--tempo", "120", "--related"), self.plain.answer(asked, "path", False, None))
 
+    def test_a_mode_alone_asks_for_all_its_keys(self):
+        for mode in ("minor", "major"):
+            self.assertEqual(self.found("--key", mode), self.plain.answer({"keys": {(note, mode) for note in range(12)}}, "path", False, None))
+
+    def test_marks_of_the_language_of_the_search_are_no_language_among_many_rows(self):
+        for terms in (['"bongo'], ['loop"s'], ["NOT bongo"], ["bongo OR"], ["kick*"], ["name:kick"], ["^kick"], ["-kick"], ["(kick)"], ["kick NEAR"], ["kick", "AND", "wav"]):
+            self.assertEqual(self.found("--", *terms), self.plain.answer({"terms": terms}, "relevance", False, None), terms)
+
     def test_orders_are_gone_along_without_sorting(self):
         """What find walks along for each order is an index of the database."""
         source = (pathlib.Path(__file__).resolve().parents[2] / "tool/shared/library/QueryOrder.cpp").read_text(encoding="utf-8")
@@ -230,6 +238,14 @@ class AgainstAPlainFilter(CommandTest):
         database.rollback()
 
 
+def find_enum(schema, word):
+    """The lists of words in a schema that have the word."""
+    for value in schema.values() if isinstance(schema, dict) else schema if isinstance(schema, list) else []:
+        if isinstance(value, list) and word in value:
+            yield value
+        yield from find_enum(value, word)
+
+
 class Typed(CommandTest):
     """What is typed and printed, over a few made rows."""
     ROWS = [
@@ -237,7 +253,7 @@ class Typed(CommandTest):
          "category": "Drums", "duration_seconds": 2.0, "sample_rate": 44100.0, "channels": 2, "frames": 88200, "descriptors": "Dry, Clean"},
         {"name": "Béla Bass.aif", "folder": "Loops/Bass/", "kind": "loop", "container_name": "AIFC", "tempo": 60.2, "key_note": 9, "mode": "both", "key": "A both",
          "category": "Bass", "artist": "Björk Öst", "duration_seconds": 90.0, "sample_rate": 48000.0, "channels": 1},
-        {"name": "Interview\n2.wav", "folder": "Talk/", "kind": "recording", "container_name": "RF64", "title": "AND \"NOT\" (the) OR*", "duration_seconds": 0.4,
+        {"name": "Interview\n2.wav", "folder": "Talk/", "kind": "recording", "container_name": "RF64", "title": "AND \"NOT\" (the) OR*", "artist": "!!!", "duration_seconds": 0.4,
          "sample_rate": 22050.5, "channels": 6, "problem": "soundIsCut", "state": "damaged"},
     ]
 
@@ -271,17 +287,42 @@ class Typed(CommandTest):
                        "minor": "BS", "A minor": "B", "A": "B", "A maj": "B"}),
             ("--rate", {"44.1k": "S", "44100": "S", "44.1 kHz": "S", "48000Hz": "B", "..44.1k": "IS", "48k..": "B"}),
             ("--channels", {"2": "S", "2..": "IS", "1..2": "BS"}),
-            ("--longer", {"2s": "BS", "2": "BS", "2001ms": "B", "1:30": "B", "1.5min": "B", "0:01:31": ""}),
+            ("--longer", {"2s": "BS", "2": "BS", "2001ms": "B", "1:30": "B", "1.5min": "B", "0:01:31": "", "1m": "B", "2m": "", "0.02h": "B", "0.03h": ""}),
             ("--shorter", {"400ms": "I", "2 s": "IS", "0.4": "I"}),
             ("--format", {"wav": "IS", "WAV": "IS", "rf64": "I", "aiff": "B", "aifc": "B", "mp3": ""}),
             ("--problem", {"truncated": "I", "any": "I", "soundiscut": "I", "unreadable": ""}),
-            ("--category", {"bass": "B", "BASS": "B"}), ("--artist", {"bjork ost": "B", "Björk": ""}), ("--kind", {"loops": "BS", "one-shot": ""}),
-            ("--since", {"yesterday": "S", "today": "", "25h": "S", "47h": "S", "60h": "BS", "1w": "BIS", "2001-01-01": "BIS", "2100-01-01T00:00:00Z": ""}),
+            ("--category", {"bass": "B", "BASS": "B"}), ("--artist", {"bjork ost": "B", "Björk": "", "!!!": "I", "—": ""}), ("--kind", {"loops": "BS", "one-shot": ""}),
+            ("--since", {"yesterday": "S", "today": "", "25h": "S", "47h": "S", "60h": "BS", "1w": "BIS", "2001-01-01": "BIS", "2100-01-01T00:00:00Z": "",
+                         "1500min": "S", "2 months": "BIS", "1 year": "BIS", "2001-01-01 23:59": "BIS"}),
         ]
         for option, values in cases:
             for value, expected in values.items():
                 with self.subTest(f"{option} {value}"):
                     self.assertEqual("".join(sorted(self.find(option, value))), expected)
+        self.assertEqual(self.find("--longer", "2", "--shorter", "2"), "S")
+
+    def test_dates_and_days_are_those_of_the_local_clock(self):
+        hours = (12 - time.gmtime(self.now).tm_hour) or 1  # there it is about noon, and never UTC
+        here = {**os.environ, "TZ": f"HERE{-hours}"}
+        with sqlite3.connect(self.index) as database:
+            for name, age in (("Shaker", 6), ("Béla", 30), ("Interview", 40)):
+                database.execute("UPDATE files SET modified = ? WHERE name LIKE ?", ((self.now - age * 3600) * 10**9, name + "%"))
+        moment = self.now - 6 * 3600
+        local, utc = (lambda seconds, form=form, ahead=ahead: time.strftime(form, time.gmtime(seconds + ahead))
+                      for form, ahead in (("%Y-%m-%dT%H:%M", hours * 3600), ("%Y-%m-%d %H:%M:%SZ", 0)))
+        for since, expected in (("today", "S"), ("yesterday", "BS"), (local(moment), "S"), (local(moment + 60), ""), (utc(moment), "S"), (utc(moment + 1), "")):
+            self.assertEqual("".join(sorted(self.find("--since", since, env=here))), expected, since)
+
+    def test_every_word_for_a_format_or_a_problem_is_one_that_records_have(self):
+        root = pathlib.Path(__file__).resolve().parents[2]
+        options = (root / "tool/shared/library/LibraryQueryOptions.cpp").read_text(encoding="utf-8")
+        coding = (root / "tool/shared/input/CodingWords.cpp").read_text(encoding="utf-8")
+        formats = {name for names in re.findall(r'\{"\w+", \{([^}]*)\}\}', options.split("formatChoices()")[1].split("\n}")[0]) for name in re.findall(r'"([^"]+)"', names)}
+        self.assertLessEqual(formats - {"AIFF", "AIFC", "RF64", "BW64"}, set(re.findall(r'"([^"]+)"\}', coding.split("containers[]")[1].split(";\n")[0])))
+        self.assertGreater(len(formats), 25)
+        kinds = set(re.findall(r'"(\w+)"', options.split("kind :")[1].split(")")[0]))
+        told = json.loads((root / "docs/schemas/info-check.json").read_text())
+        self.assertEqual(kinds - {"unreadable"}, set(next(find_enum(told, "containerIsCut"))))
 
     def test_words_are_looked_for_and_never_understood_as_more(self):
         cases = {"shak": "S", "SHAKER": "S", "haker": "", "bela": "B", "Béla": "B", "bjork": "B", "bela loops": "", "loops bass": "B", "loops/bass": "B", "drums": "S", "dry clean": "S",
@@ -304,18 +345,21 @@ class Typed(CommandTest):
         self.assertEqual(paths(self.root + "Loops/Bass"), [self.root + bass])
         self.assertEqual(paths("bela", "Loops"), [self.root + bass])  # the second word is one to look for
         self.assertEqual(paths("bela", "Loops/"), [bass])
+        self.assertEqual(paths("bela", "."), [f"./{bass}"])
         self.assertEqual(paths("Gone/", status=1), [])
+        self.assertEqual(paths("Gone/../Loops/Bass/"), ["Gone/../Loops/Bass/Béla Bass.aif"])
         os.symlink("Loops", self.folder / "link")
         self.assertEqual(paths("link/Bass"), ["link/Bass/Béla Bass.aif"])
         self.assertEqual(paths("shak"), [self.root + "Loops/Shaker_01.wav"])
         self.assertEqual(paths("interview"), [self.root + "Talk/Interview\\x0A2.wav"])
-        self.assertEqual(len(paths("Talk/", "Loops/Bass/")), 2)
+        self.assertEqual(paths("Talk/", "./Loops/Bass/"), [f"./{bass}", "Talk/Interview\\x0A2.wav"])
 
     def test_wrong_values_are_told_with_what_is_right(self):
         cases = {("--tempo", "fast"): "118..122", ("--tempo", "122..118"): "118..122", ("--tempo", ".."): "118..122", ("--key", "H"): "F# minor", ("--key", ""): "F# minor",
                  ("--kind", "lop"): 'did you mean "loop"?', ("--format", "flacc"): 'did you mean "flac"?', ("--problem", "truncate"): 'did you mean "truncated"?', ("--sort", "temop"): 'did you mean "tempo"?',
                  ("--rate", "fast"): "48k", ("--channels", "two"): "number of channels", ("--longer", "-1"): "500ms", ("--shorter", "1:75"): "500ms", ("--since", "2026-02-30"): "2026-11-01",
-                 ("--since", "2026-13-01"): "yesterday", ("--since", "tomorrow"): "yesterday", ("--limit", "-1"): "--limit", ("--related",): "--key or --tempo",
+                 ("--since", "2026-13-01"): "yesterday", ("--since", "tomorrow"): "yesterday", ("--since", "2026-01-01T24:00"): "yesterday", ("--since", "2026-01-01T12:00:60"): "yesterday", ("--since", "99999999999d"): "yesterday",
+                 ("--since", "2026-01-01T"): "yesterday", ("--since", "2026-01-01T12"): "yesterday", ("--limit", "-1"): "--limit", ("--related",): "--key or --tempo",
                  ("--longer", "3", "--shorter", "2"): "--longer", ("--sort", "relevance"): "words", ("--json",): "-0"}
         for typed, told in cases.items():
             with self.subTest(typed):

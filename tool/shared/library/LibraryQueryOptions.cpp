@@ -82,11 +82,6 @@ Argument addChoice(Verb& verb, const std::string& name, const std::string& label
         .label(label);
 }
 
-void appendAll(std::vector<std::string>& values, const std::vector<std::string>& further)
-{
-    values.insert(values.end(), further.begin(), further.end());
-}
-
 std::span<const Choice> formatChoices()
 {
     static const std::vector<Choice> choices = {{"wav", {"WAVE", "RF64", "BW64"}},
@@ -230,15 +225,14 @@ void addSoundOptions(Verb& verb, LibraryQuery& query)
         [&](NumberRange range) { query.channels = range; }, "Of so many channels, or in a range: 2, 3..",
         "number of channels: 2, or 3.. is one");
     addChoice(
-        verb, "--format", "FORMAT", formatChoices(),
-        [&](const Choice& choice) { appendAll(query.containers, choice.meant); },
+        verb, "--format", "FORMAT", formatChoices(), [&](const Choice& choice) { query.containers = choice.meant; },
         "wav, aiff, caf, mp3, m4a, flac, ogg, and others", "format",
         "wav, aiff, aifc, caf, mp3, aac, m4a, flac, ogg, wma, wavpack, w64 are some");
     addChoice(
         verb, "--problem", "KIND", problemChoices(),
         [&](const Choice& choice) {
-            query.takesAnyProblem = query.takesAnyProblem || choice.meant.empty();
-            appendAll(query.problems, choice.meant);
+            query.takesAnyProblem = choice.meant.empty();
+            query.problems = choice.meant;
         },
         "With that problem: truncated, unreadable, a kind that info --check names, or any", "problem",
         "any, truncated, unreadable, or a kind that info --check names, such as soundIsCut, is one");

@@ -95,7 +95,7 @@ std::optional<std::int64_t> dateFromText(std::string_view text)
     if (!text.empty() && text != "Z") {
         if (!take(time.tm_hour, 2, ":", 0, 23, 0) || text.empty() || !take(time.tm_min, 2, ":", 0, 59, 0))
             return std::nullopt;
-        if (!text.empty() && text != "Z" && !take(time.tm_sec, 2, "", 0, 60, 0))
+        if (!text.empty() && text != "Z" && !take(time.tm_sec, 2, "", 0, 59, 0))
             return std::nullopt;
     }
     if (!text.empty() && text != "Z")

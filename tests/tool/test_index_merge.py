@@ -89,14 +89,15 @@ class MergeTest(CommandTest):
             "not UTF-8": bad().encode() + b"\xff",
             "a key twice": bad()[:-1] + ', "indexed": 7}', "an escaped key": bad()[:-1] + ', "f\\u0069elds": []}', "an unknown key": bad(colour="red"),
             "a relative path": line("m/bad.wav"), "dots": line("/m/../bad.wav"), "a dot": line("/m/./bad.wav"), "two slashes": line("/m//bad.wav"),
-            "a folder": line("/m/bad/"), "only dots": line("/m/.."), "a NUL": line("/m/b\0d"), "no name": line("/"), "long": line("/m/" + "x" * 2000),
+            "a folder": line("/m/bad/"), "only dots": line("/m/.."), "a NUL": line("/m/b\0d"), "no name": line("/"), "long": line("/m/" + "x" * 2000), "a long folder": line("/m/" + 66 * ("x" * 1000 + "/") + "a"),
             "a fraction": bad(frames=1.5), "a number too large": bad(frames=2**63), "an infinite one": bad(tempo=0)[:-2] + "1e999}", "NaN": bad(tempo=float("nan")),
             "a negative count": bad(frames=-1), "a negative size": bad(size=-1), "no stamp": bad().replace("stamp", "seal"), "half a stamp": bad().replace('"inode"', '"node"'), "words in one": bad(descriptors=["a, b"]), "a text for a number": bad(channels="2"), "a number for a text": bad(title=2),
-            "a number for a truth": bad(floatingPoint=1), "a note": bad(keyNote=12), "a state": bad(state="great"), "no state": bad(state=""),
+            "a number for a truth": bad(floatingPoint=1), "a note": bad(keyNote=12), "a note below": bad(keyNote=-1), "ahead of 1970": bad(indexed=-1), "a state": bad(state="great"), "no state": bad(state=""),
             "a kind": bad(kind="x"), "ahead of time": bad(indexed=int(time.time()) + 10**6), "odd points": bad(overview={"framesPerPoint": 256, "points": "AA=="}),
             "points that are none": bad(overview={"framesPerPoint": 256, "points": "AA*A"}), "many points": bad(overview={"framesPerPoint": 256, "points": points(300_000)}),
             "more than there are frames": bad(frames=256, overview={"framesPerPoint": 256, "points": points(6)}),
-            "points of nothing": bad(overview={"framesPerPoint": 0, "points": ""}), "points of 300": bad(overview={"framesPerPoint": 300, "points": ""}),
+            "points of nothing": bad(overview={"framesPerPoint": 0, "points": ""}), "points of 300": bad(overview={"framesPerPoint": 300, "points": ""}), "points of 2^41": bad(overview={"framesPerPoint": 2**41, "points": ""}),
+            "cut points": bad(overview={"framesPerPoint": 256, "points": "AAA"}),
             "fields": bad(fields={}), "fields without names": bad(fields=[{"value": 1}]), "tags": bad(loopTags=[]), "problems": bad(problems=[{"kind": "x"}]),
             "a root": '{"root": "m/"}', "a root without end": '{"root": "/m"}', "deep": "[" * 1_000_000,
         }
@@ -106,6 +107,7 @@ class MergeTest(CommandTest):
             with self.subTest(name):
                 text = text if isinstance(text, bytes) else text.encode()
                 self.assertIn("-: line 2: ", self.merge("-", stdin=b"\n" + text, status=1).stderr.decode())
+        self.assertIn("a line has more than 64 MiB", self.merge("-", stdin=b"x" * (65 << 20), status=1).stderr.decode())
         self.assertEqual(self.export(), before)
 
     def test_what_stands_before_a_bad_line_stays_and_other_sources_are_merged(self):
@@ -155,6 +157,30 @@ class MergeTest(CommandTest):
         for order in itertools.permutations(["0.jsonl", "1.jsonl", "2.jsonl"]):
             self.merge(*order, db="".join(order))
             self.assertEqual({path: record.get("title") for path, record in self.files("".join(order)).items()}, {**titles, "/m/sub/d.wav": None})
+
+    def test_of_what_is_of_one_time_the_later_change_wins_and_sound_over_none(self):
+        ages = ["changed", "modified", "size", "inode"]
+        lines = [line("/m/a.wav", title=name, **{key: STAMP[key] + 1 for key in ages[ages.index(name):]}) for name in ages] + [line("/m/a.wav", title="least")]
+        lines += [line("/m/b.wav", title=title) for title in ("one", "two")]
+        for order in (lines, lines[::-1]):
+            self.merged(*order, db="all.db")
+            self.assertEqual([record["title"] for _, record in sorted(self.files().items())], ["changed", "two"])
+            (self.folder / "all.db").unlink()
+        # A file that was no sound when it was looked at, and is sound now, is new.
+        self.merged(line("/m/b.wav"), db="none.db")
+        with sqlite3.connect(self.folder / "none.db") as database:
+            database.execute("UPDATE seen SET file = NULL, changed = 5")
+            database.execute("DELETE FROM files")
+        for db in ("none.db", "sound.db"):
+            self.merged(line("/m/b.wav", 6), db="sound.db")
+            self.merge({"none.db": "sound.db", "sound.db": "none.db"}[db], db=db)
+            self.assertEqual(list(self.files(db)), ["/m/b.wav"])
+        self.assertEqual(json.loads(self.merge("--jsonl", "sound.db", db="none.db").stdout)["counts"], {"added": 0, "changed": 0, "unchanged": 1, "passedOver": 0})
+
+    def test_words_of_folders_begin_with_the_outermost_root_from_its_line_on(self):
+        self.merged("\n".join([line("/m/sub/a.wav"), '{"root":"/m/sub/"}', '{"root":"/m/"}', line("/m/sub/b.wav"), line("/x/m/c.wav"), line("/d.wav")]), db="all.db")
+        with sqlite3.connect(self.folder / "all.db") as database:
+            self.assertEqual(dict(database.execute("SELECT path, words FROM folders")), {"/m/sub/": "m/sub/", "/x/m/": "m/", "/": ""})
 
     def test_twice_is_once(self):
         self.merged("\n".join(line(f"/m/{i}.wav", title=str(i)) for i in range(50)), db="a.db")

@@ -18,7 +18,7 @@ import subprocess
 import unittest
 import urllib.parse
 
-from command import KTFILES, MEDIA, CommandTest
+from command import KTFILES, MEDIA, CommandTest, chunk, wave
 from test_failing_calls import TRACES
 from test_overview import pcm
 
@@ -180,11 +180,39 @@ class Written(PageTest):
         crossings = sum(a < 0 <= b for a, b in zip(samples, samples[1:]))
         self.assertAlmostEqual(crossings, 3000, delta=3)
         before = long.stat().st_mtime_ns
+        os.unlink(self.sounds / "tone-16.aiff")  # is gone, and needs none
         self.page("--previews")
         self.assertEqual(long.stat().st_mtime_ns, before)
+        self.assertEqual({row["name"] for row in self.data()["rows"] if "preview" in (row["more"] or {})}, {"long.aiff", "tone-adpcm.wav", "pluck-24-le.caf"})
         self.page("--embed-previews")
         embedded = re.search(r'id="previews">(.*?)</script>', (self.folder / "library.html").read_text(encoding="utf-8"), re.S).group(1)
         self.assertIn(base64.b64encode(long.read_bytes()).decode(), json.loads(embedded).values())
+        # Of a sound that has changed, another one.
+        changed = bytearray((self.sounds / "long.aiff").read_bytes())
+        changed[-48000 * 4 * 11:] = bytes(48000 * 4 * 11)
+        (self.sounds / "long.aiff").write_bytes(changed)
+        self.index()
+        self.page("--previews")
+        more, = (row["more"] for row in self.data()["rows"] if row["name"] == "long.aiff")
+        self.assertEqual(set((self.folder / more["preview"]).read_bytes()[-100:]), {0})
+        for number in range(76):
+            os.link(self.sounds / "long.aiff", self.sounds / f"{number}.aiff")
+        self.index()
+        self.assertIn("64 MB at most", self.failure("page", "--db", "l.db", "-o", "many.html", "--embed-previews"))
+
+    def test_what_a_row_says_of_odd_sound(self):
+        comment = "x" + "ü" * 500
+        self.add("words.wav", wave(chunk(b"LIST", b"INFO" + chunk(b"ICMT", comment.encode() + b"\0"))))
+        fmt = chunk(b"fmt ", struct.pack("<HHIIHH", 3, 1, 44100, 352800, 8, 64))
+        body = b"WAVE" + fmt + chunk(b"data", bytes(8000))
+        self.add("double.wav", b"RIFF" + struct.pack("<I", len(body)) + body)
+        self.index()
+        self.page()
+        rows = {row["name"]: row for row in self.data()["rows"]}
+        self.assertEqual(rows["words.wav"]["more"]["words"], "x" + "ü" * 119)
+        texts = self.data()["texts"]
+        self.assertEqual([(texts[rows[name]["type"]], texts[rows[name]["detail"]]) for name in ("words.wav", "double.wav")],
+                         [("audio/wav", "16-bit 48k"), ("", "64-bit float 44.1k")])
 
 
 class Browsing(PageTest):
@@ -565,6 +593,8 @@ class Served(PageTest):
         self.assertEqual((status, headers["Cache-Control"], headers["X-Content-Type-Options"], headers["Referrer-Policy"]),
                          (200, "no-store", "nosniff", "no-referrer"))
         self.assertIn("frame-ancestors 'none'", headers["Content-Security-Policy"])
+        self.assertEqual((headers["Cross-Origin-Resource-Policy"], headers["Content-Type"]), ("same-origin", "text/html; charset=utf-8"))
+        self.assertEqual(self.ask(self.path + "file/0")[2]["Content-Type"], "audio/wav")
         self.assertNotIn(os.fsencode(self.folder), body)
         # Of this machine only.
         address = socket.getaddrinfo(socket.gethostname(), None, socket.AF_INET)[0][4][0]
@@ -585,6 +615,15 @@ class Served(PageTest):
         os.symlink("d.wav", self.sounds / "c.wav")
         for kind in ("file", "decoded"):
             self.assertEqual([self.ask(f"{self.path}{kind}/{row}")[0] for row in range(4)], [404, 404, 200, 200])
+
+    def test_a_file_that_was_indexed_alone_is_given_out(self):
+        self.add("a.wav", loop())
+        self.add("b.wav", loop())
+        self.run_command("index", "Loops/a.wav", "Loops/b.wav", "--db", "l.db", "--quiet")
+        self.serve()
+        os.rename(self.sounds / "b.wav", self.folder / "b.wav")
+        (self.sounds / "b.wav").symlink_to("../b.wav")
+        self.assertEqual([self.ask(f"{self.path}file/{row}")[0] for row in range(2)], [200, 404])
 
     def test_ranges(self):
         self.add("a.wav", loop())
@@ -621,6 +660,12 @@ class Served(PageTest):
         if len(expected) == len(whole):
             worst = max(abs(a - b) for a, b in zip(*(struct.unpack(f"<{(len(whole) - 44) // 2}h", sound[44:]) for sound in (whole, expected))))
             self.assertLessEqual(worst, 1)
+        with open(self.sounds / "a.caf", "r+b") as file:  # what is left of it is heard to its end
+            file.truncate(os.path.getsize(self.sounds / "a.caf") // 2)
+        left = self.ask(self.path + "decoded/0")[1]
+        self.assertGreater(len(left), len(whole) // 3)
+        self.assertEqual(left[44:], whole[44:len(left)])
+        shutil.copy(MEDIA / "pluck-24-le.caf", self.sounds / "a.caf")
         noise = random.Random(7)
         for first, length in [(0, 10), (40, 8), (43, 3), (45, 7), *((noise.randrange(len(whole)), noise.randrange(1, 9000)) for _ in range(30))]:
             self.assertEqual(self.ask(self.path + "decoded/0", Range=f"bytes={first}-{first + length - 1}")[1], whole[first:first + length])
@@ -667,7 +712,7 @@ class Served(PageTest):
 class ServedInBrowser(Browsing, Served):
     # The tests of the server itself run once.
     test_nothing_without_the_token_and_nothing_but_the_rows = test_ranges = None
-    test_a_file_that_is_swapped_is_not_given_out = test_what_is_decoded_is_the_sound_from_anywhere = None
+    test_a_file_that_is_swapped_is_not_given_out = test_a_file_that_was_indexed_alone_is_given_out = test_what_is_decoded_is_the_sound_from_anywhere = None
     test_it_ends_at_once_while_a_browser_holds_connections = test_a_port_of_choice_and_one_that_is_taken = None
     test_ranges_without_end_do_not_exhaust_a_small_stack = test_fewer_threads_than_wished_for = None
 

@@ -1,6 +1,7 @@
 #include "tool/page/PageRow.h"
 
 #include "tool/page/PageWave.h"
+#include "tool/shared/indexing/BoundedText.h"
 #include "tool/shared/output/Failure.h"
 
 #include <fmt/format.h>
@@ -77,7 +78,7 @@ std::string wordsOf(const LibraryRecord& record)
     for (const std::string* const text : {&record.title, &record.artist, &record.album, &record.genre,
                                           &record.subCategory, &record.descriptors, &record.comment})
         if (!text->empty() && words.size() < kMostWords)
-            words += (words.empty() ? "" : "\n") + text->substr(0, kMostWords);
+            words += (words.empty() ? "" : "\n") + boundedLine(*text, kMostWords);
     return words;
 }
 

@@ -112,7 +112,8 @@ std::string pathOf(const platform::OwnedDescriptor& file)
     return length > 0 && length < PATH_MAX ? std::string(path, static_cast<std::size_t>(length)) : std::string();
 }
 
-// The file of a row: regular, and where it really is below a folder that was indexed. Invalid otherwise.
+// The file of a row: regular, and where it really is its place in the index, or below a folder that was indexed.
+// Invalid otherwise.
 platform::OwnedDescriptor openedSound(const PageRow& row, const std::vector<std::string>& roots, struct stat& status)
 {
     // A FIFO that took the file's name must not hold the server up.
@@ -121,8 +122,9 @@ platform::OwnedDescriptor openedSound(const PageRow& row, const std::vector<std:
     if (!file || ::fstat(file.get(), &status) != 0 || !S_ISREG(status.st_mode))
         return {};
     const std::string path = pathOf(file);
-    const bool isBelow = std::ranges::any_of(roots, [&](const std::string& root) { return path.starts_with(root); });
-    return isBelow ? std::move(file) : platform::OwnedDescriptor();
+    const bool isKnown = path == row.place.path() ||
+                         std::ranges::any_of(roots, [&](const std::string& root) { return path.starts_with(root); });
+    return isKnown ? std::move(file) : platform::OwnedDescriptor();
 }
 
 // The media type for the header, without what decides only whether a browser plays it.

@@ -10,7 +10,7 @@ import subprocess
 import time
 import unittest
 
-from command import INSTRUMENTED, KTFILES, LIBRARY, MEDIA, CommandTest, wave
+from command import INSTRUMENTED, KTFILES, LIBRARY, MEDIA, CommandTest, chunk, wave
 from test_failing_calls import TRACES
 
 KILLS = int(os.environ.get("KTFILES_KILLS", "20"))
@@ -128,6 +128,31 @@ class Index(IndexTest):
         self.assertEqual(json.loads(told.stdout)["counts"]["unchanged"], 2)
         self.assertEqual(self.index("lib"), self.changes(changed=2))
 
+    def test_an_inode_that_is_given_to_another_file_is_no_move(self):
+        self.make("lib/a.wav")
+        self.index("lib")
+        os.link(self.folder / "lib/a.wav", self.folder / "lib/z.wav")
+        os.unlink(self.folder / "lib/a.wav")
+        (self.folder / "lib/z.wav").write_bytes(wave(frames=900))
+        self.assertEqual(self.index("lib"), self.changes(added=1, removed=1))
+        self.assertEqual(self.query("SELECT name, frames FROM files"), [("z.wav", 900)])
+
+    def test_what_was_known_of_a_file_goes_when_it_changes(self):
+        self.make("lib/repaired")
+        tagged = wave(chunk(b"LIST", b"INFO" + chunk(b"ICMT", b"forgotten\0")), size=100)
+        for name in ("repaired", "silent", "text", "gone"):
+            self.write(f"lib/{name}", tagged)
+        self.index("lib")
+        self.assertEqual([count for count, in self.query("SELECT count(*) FROM findings UNION ALL SELECT count(*) FROM overviews")], [8, 4])
+        self.make("lib/repaired", "lib/silent", frames=500)
+        self.write("lib/text", b"no sound any more")
+        os.unlink(self.folder / "lib/gone")
+        self.assertEqual(self.index("lib", "--no-overview"), self.changes(changed=2, removed=2, passedOver=1))
+        self.assertEqual(self.query("SELECT name, state, frames FROM files ORDER BY name"), [("repaired", "whole", 500), ("silent", "whole", 501)])
+        for table in ("findings", "overviews", "search WHERE search MATCH 'forgotten'"):
+            self.assertEqual(self.query(f"SELECT count(*) FROM {table}"), [(0,)], table)
+        self.assert_sound()
+
     def test_an_index_with_hashes_keeps_them_of_files_that_change(self):
         self.make("lib/a.wav", "lib/b.wav")
         self.index("lib", "--hash")
@@ -159,7 +184,34 @@ class Index(IndexTest):
         os.unlink(self.folder / "single/d.wav")
         self.assertEqual(self.index("single/d.wav"), self.changes(removed=1))
         self.failure("index", "--db", "none.db", status=2)
+        self.failure("index", "lib", "--db", "no/such.db")
+        self.assertFalse((self.folder / "no").exists())
+        (self.folder / "empty").mkdir()
+        self.assertEqual(self.index("empty"), self.changes())
+        (self.folder / "empty").rmdir()
+        self.index(status=1)
+        self.assertRegex(self.told[0], "empty: is not there; .* kept")
+        self.assertEqual(self.index("--prune"), self.changes(unchanged=1))
+        self.assertEqual(self.index(), self.changes(unchanged=1))
         self.assert_sound()
+
+    def test_a_link_in_the_place_of_a_file_is_told_and_the_file_kept(self):
+        self.make("lib/a.wav", "lib/b.wav")
+        self.index("lib")
+        os.unlink(self.folder / "lib/a.wav")
+        (self.folder / "lib/a.wav").symlink_to("volume/a.wav")
+        self.assertEqual(self.index("lib", status=1), self.changes(unchanged=1, problems=1))
+        self.assertRegex(self.told[0], r"lib/a\.wav: .*leads nowhere")
+        self.assertEqual(sorted(self.rows()), ["lib/a.wav", "lib/b.wav"])
+        (self.folder / "lib/volume/a.wav").mkdir(parents=True)  # to a folder, it is no file any more
+        self.assertEqual(self.index("lib"), self.changes(removed=1, unchanged=1))
+
+    def test_a_hidden_folder_that_was_named_stays_though_no_walk_comes_by(self):
+        self.make("lib/a.wav", "lib/.mine/b.wav", "lib/deep/.own/c.wav")
+        self.assertEqual(self.index("lib", "lib/.mine", "lib/deep/.own", "lib/.mine/b.wav"), self.changes(added=3))
+        self.assertEqual(self.index("lib"), self.changes(unchanged=1))
+        self.assertEqual(self.index(), self.changes(unchanged=3))
+        self.assertEqual(self.index("lib", "lib/a.wav", "lib/deep"), self.changes(unchanged=1), "each once")
 
     @needs_mounts
     def test_volumes_that_are_not_mounted(self):
@@ -289,6 +341,18 @@ class Index(IndexTest):
                                      KTFILES, "index", "lib", "--db", "library.db"], cwd=self.folder, capture_output=True, text=True)
             self.assertEqual((result.returncode, result.stderr.splitlines()[-1]), (1, f"ktfiles: {deep}: input/output error"), call)
             self.assertEqual(self.rows(), {path: row for path, row in rows.items() if path != "lib/z.wav"})
+        # A folder that is gone when its turn comes is no problem, and its files are looked for.
+        result = subprocess.run(["strace", "-f", "-o", "/dev/null", "-P", deep + "/", "-e", "trace=openat", "-e", "inject=openat:error=ENOENT",
+                                 KTFILES, "index", "lib", "--db", "library.db"], cwd=self.folder, capture_output=True, text=True)
+        self.assertEqual((result.returncode, "ktfiles:" in result.stderr, sorted(self.rows())), (0, False, ["lib/a.wav", "lib/deep/deeper/c.wav"]))
+        self.make("lib/deep/b.wav")
+        self.index("lib")
+        os.unlink(self.folder / "lib/deep/b.wav")
+        # What the system cannot say of a file that is not listed any more.
+        result = subprocess.run(["strace", "-f", "-o", "/dev/null", "-P", deep + "/b.wav", "-e", "trace=%file", "-e", "inject=%file:error=EIO",
+                                 KTFILES, "index", "lib", "--db", "library.db"], cwd=self.folder, capture_output=True, text=True)
+        self.assertEqual((result.returncode, result.stderr, "lib/deep/b.wav" in self.rows()), (0, "", True))
+        self.assertEqual(self.index("lib"), self.changes(removed=1, unchanged=2))
         # What the system refuses is tried again, what is no audio is not.
         self.make("lib/locked.wav")
         self.write("lib/empty.wav", b"")
@@ -412,6 +476,13 @@ class Watch(IndexTest):
         os.unlink(self.folder / "lib/c.wav")
         shutil.rmtree(self.folder / "lib/deep")
         self.until("lib/renamed/folder/d.wav", "lib/renamed/folder/e.wav")
+        # Names of files that are there announce no end of writing.
+        self.make("outside.wav")
+        os.link(self.folder / "outside.wav", self.folder / "lib/hard.wav")
+        (self.folder / "lib/soft.wav").symlink_to("../outside.wav")
+        self.until("lib/renamed/folder/d.wav", "lib/renamed/folder/e.wav", "lib/hard.wav", "lib/soft.wav")
+        os.unlink(self.folder / "lib/hard.wav")
+        os.unlink(self.folder / "lib/soft.wav")
         # More than the system's queue holds.
         process.send_signal(signal.SIGSTOP)
         two = [os.open(self.folder / f"lib/{name}.txt", os.O_CREAT | os.O_WRONLY) for name in "xy"]
@@ -422,6 +493,14 @@ class Watch(IndexTest):
         self.make("lib/renamed/f.wav", "lib/late/g.wav")
         process.send_signal(signal.SIGCONT)
         self.until("lib/renamed/folder/d.wav", "lib/renamed/folder/e.wav", "lib/renamed/f.wav", "lib/late/g.wav")
+        self.assertEqual(self.end(process), "")
+
+    def test_what_ignores_a_signal_goes_on(self):
+        self.make("lib/a.wav")
+        process = self.watch("env", "--ignore-signal=HUP")
+        process.send_signal(signal.SIGHUP)
+        self.make("lib/b.wav")
+        self.until("lib/a.wav", "lib/b.wav")
         self.assertEqual(self.end(process), "")
 
     def test_a_root_that_goes_and_comes(self):

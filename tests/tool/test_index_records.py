@@ -1,6 +1,7 @@
 """What an index knows about a file: the same that the other verbs say of it, within bounds, and of whatever file."""
 import base64
 import contextlib
+import hashlib
 import json
 import os
 import shutil
@@ -95,7 +96,7 @@ class IndexRecords(CommandTest):
         whole = {name: (self.folder / "lib" / name).read_bytes() for name in os.listdir(self.folder / "lib")}
         damaged = {"cut.wav": whole["s.wav"][:9000], "cut.aiff": whole["m.aiff"][:9000], "cut.caf": whole["m.caf"][:9000],
                    "cut.mp3": whole["l.mp3"][:900], "cut.flac": whole["f.flac"][:3000], "cut.ogg": whole["o.ogg"][:3000],
-                   "stray.wav": whole["s.wav"] + b"stray bytes", "late.wav": wave(acid(tempo=90), info(INAM=b"late"), size=100),
+                   "stray.wav": whole["s.wav"] + b"stray bytes", "uneven.wav": whole["s.wav"][:40] + struct.pack("<I", 8001) + whole["s.wav"][44:8046], "late.wav": wave(acid(tempo=90), info(INAM=b"late"), size=100),
                    "acid.wav": wave(acid(flags=2, root=61, beats=8, tempo=120), frames=192000)}
         for name, content in damaged.items():
             (self.folder / "lib" / name).write_bytes(content)
@@ -190,6 +191,7 @@ class IndexRecords(CommandTest):
     def test_texts_and_lists_of_any_size_make_small_records(self):
         long = ("\u00fc" * 500_000).encode()
         self.write("lib/comment.wav", wave(info(ICMT=long, INAM=b"line 1\r\nline 2\0\0")))
+        self.write("lib/odd.wav", wave(info(ICMT=b"x" + long)))
         self.write("lib/unheld.wav", wave(info(ICMT=long * 10, INAM=b"title"), acid(tempo=80)))
         self.write("lib/fields.wav", wave(info(**{f"I{number:03}": b"value" for number in range(1000)}), *[info(ICMT=b"x" * 3000)] * 1000))
         cues = chunk(b"cue ", struct.pack("<I", 80_000) + b"".join(struct.pack("<II4sIII", n, n, b"data", 0, 0, n) for n in range(80_000)))
@@ -198,6 +200,7 @@ class IndexRecords(CommandTest):
         for name, record in records.items():
             self.assertLess(len(json.dumps(record)), 1_500_000, name)
         comment = records["comment.wav"]
+        self.assertEqual(records["odd.wav"]["comment"], "x" + "\u00fc" * 2047, "whole characters only")
         self.assertEqual((comment["comment"], comment["title"]), ("\u00fc" * 2048, "line 1  line 2"))
         value = next(field for field in comment["fields"] if field["name"] == "info.ICMT")
         self.assertEqual((value["value"], value["size"]), ("\u00fc" * 2048, len(long)))
@@ -227,6 +230,13 @@ class IndexRecords(CommandTest):
         self.assertEqual((record["frames"], record["state"], record["overview"]["framesPerPoint"]), (size // 4, "whole", 256 << 18))
         points = base64.b64decode(record["overview"]["points"])
         self.assertEqual((points[:2], set(points[2:])), (b"\x81\x7f", {0}))
+        # To hash it, all is read.
+        size = 80_000_000
+        with open(self.folder / "lib/hole.wav", "wb") as file:
+            file.write(long_wave(4096, 0)[:40] + struct.pack("<I", size))
+            file.truncate(44 + size)
+        record = self.records("--hash")["hole.wav"]
+        self.assertEqual((record["soundHash"], set(base64.b64decode(record["overview"]["points"]))), (hashlib.sha256(bytes(size)).hexdigest(), {0}))
 
     @unittest.skipUnless(shutil.which("ffmpeg"), "no ffmpeg")
     def test_the_same_sound_with_other_tags_has_the_same_hash(self):
@@ -245,6 +255,14 @@ class IndexRecords(CommandTest):
             self.assertEqual(hashes[0], hashes[1], kind)
             self.assertNotEqual(hashes[0], hashes[2], kind)
         self.assertEqual(records["s.wav"]["soundHash"], records["b.wav"]["soundHash"])
+
+    def test_problems_are_as_many_as_can_be_kept_and_digests_are_compared_with_hashes(self):
+        self.write("lib/many.wav", wave(*[chunk(b"cue ", b"\1")] * 3000))
+        self.write("lib/wrong.wav", wave(chunk(b"MD5 ", bytes(16))))
+        records = self.records("--hash")
+        self.assertEqual((len(records["many.wav"]["problems"]), records["many.wav"]["state"]), (1000, "damaged"))
+        self.assertEqual([problem["kind"] for problem in records["wrong.wav"].get("problems", [])], ["digestDiffers"])
+        self.assertEqual(self.records()["wrong.wav"]["state"], "whole", "what is not read to its end is not judged by it")
 
     def test_files_that_are_no_sound(self):
         tone = (MEDIA / "tone-16.aiff").read_bytes()
@@ -295,6 +313,8 @@ class IndexRecords(CommandTest):
             process.wait(timeout=20)
         self.assertEqual(process.returncode, -signal.SIGTERM)
         self.assertEqual(self.known(), {}, "a file that was not read to its end is not told")
+        roots = [json.loads(line) for line in self.lines("index", "export", "--db", "index.db")]
+        self.assertEqual([root for root in roots if "completed" in root], [])
 
     def test_a_file_that_shrinks_while_it_is_read_ends_well(self):
         content = long_wave(20_000_000, 37)

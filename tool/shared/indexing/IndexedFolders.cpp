@@ -29,10 +29,12 @@ bool VanishedFile::isGone() const
 {
     struct stat status = {};
     const std::string path = folder + nameOfIndexed(text);
-    // A link that leads nowhere may lead to a volume that is not mounted.
     if (::lstat(path.c_str(), &status) != 0)
         return errno == ENOENT || errno == ENOTDIR;
-    return !S_ISLNK(status.st_mode) && !S_ISREG(status.st_mode);
+    // A link that leads nowhere may lead to a volume that is not mounted.
+    if (S_ISLNK(status.st_mode) && ::stat(path.c_str(), &status) != 0)
+        return false;
+    return !S_ISREG(status.st_mode);
 }
 
 std::uint64_t deviceOfNearest(std::string folder)

@@ -27,7 +27,6 @@ constexpr const char* kInUse = "inUse";           // the kind of a problem
 constexpr double kLongestWait = 2;                // in seconds, for other programs
 constexpr std::chrono::seconds kQuick{1};         // what took longer is not read again at once
 constexpr int kMostReadings = 3;                  // of a file that changes while it is read
-constexpr std::size_t kMostProblems = 1000;       // of a file
 constexpr std::size_t kMostOfProblem = 1024;      // bytes of a text
 
 std::int64_t inNanoseconds(const timespec& time)
@@ -175,8 +174,7 @@ private:
 
     void addProblem(const char* kind, const std::string& text)
     {
-        if (record_.problems.size() < kMostProblems)
-            record_.problems.push_back({kind, boundedLine(text, kMostOfProblem)});
+        record_.problems.push_back({kind, boundedLine(text, kMostOfProblem)});
     }
 
     void fail(const char* kind, const std::string& text)

@@ -325,8 +325,7 @@ void LibraryUpdating::noteVanishedBelow(const std::string& path)
 void LibraryUpdating::finish()
 {
     for (const std::string& folder : whole_)
-        if (!isKept(folder))
-            noteVanishedBelow(folder);
+        noteVanishedBelow(folder);
     batch_.remove(std::move(vanished_));
     std::vector<std::string> complete, absent;
     for (const std::string& root : starts_.roots)

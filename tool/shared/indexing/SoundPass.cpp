@@ -133,7 +133,7 @@ private:
             return false;
         const std::int64_t offset = info_.dataOffset + frame * info_.bytesPerFrame;
         if (offset >= endOfHole_)
-            endOfHole_ = sparse_.endOfHole(offset, frames * info_.bytesPerFrame);
+            endOfHole_ = sparse_.endOfHole(offset);
         return endOfHole_ - offset >= frames * info_.bytesPerFrame;
     }
 

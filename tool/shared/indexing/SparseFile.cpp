@@ -21,11 +21,10 @@ SparseFile::SparseFile(const std::string& path, std::int64_t size)
 {
 }
 
-std::int64_t SparseFile::endOfHole(std::int64_t offset, std::int64_t bytes)
+std::int64_t SparseFile::endOfHole(std::int64_t offset)
 {
     if (!file_)
         return offset;
     const off_t data = ::lseek(file_.get(), offset, SEEK_DATA);
-    const off_t end = data < 0 ? ::lseek(file_.get(), 0, SEEK_END) : data; // an error: no data behind
-    return end - offset >= bytes ? end : offset;
+    return data < 0 ? ::lseek(file_.get(), 0, SEEK_END) : data; // an error: no data behind
 }

@@ -12,8 +12,8 @@ public:
     /// `size` is that of the file, in bytes.
     SparseFile(const std::string& path, std::int64_t size);
 
-    /// Where the hole ends that contains so many bytes from `offset` on; `offset` if there is none.
-    std::int64_t endOfHole(std::int64_t offset, std::int64_t bytes);
+    /// Where the hole ends that `offset` is in; `offset` if it is in none.
+    std::int64_t endOfHole(std::int64_t offset);
 
 private:
     platform::OwnedDescriptor file_;

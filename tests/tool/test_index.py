@@ -486,7 +486,6 @@ class Watch(IndexTest):
         # More than the system's queue holds.
         process.send_signal(signal.SIGSTOP)
         two = [os.open(self.folder / f"lib/{name}.txt", os.O_CREAT | os.O_WRONLY) for name in "xy"]
-        (self.folder / "lib").mkdir()
         for number in range(20_000):
             os.fchmod(two[number % 2], 0o600 + number % 3)
         list(map(os.close, two))

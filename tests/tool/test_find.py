@@ -212,6 +212,13 @@ class AgainstAPlainFilter(CommandTest):
         for terms in (['"bongo'], ['loop"s'], ["NOT bongo"], ["bongo OR"], ["kick*"], ["name:kick"], ["^kick"], ["-kick"], ["(kick)"], ["kick NEAR"], ["kick", "AND", "wav"]):
             self.assertEqual(self.found("--", *terms), self.plain.answer({"terms": terms}, "relevance", False, None), terms)
 
+    def test_rare_problems_and_words_that_stand_in_one_part_of_the_index(self):
+        for problem in ("padIsMissing", "soundIsCut", "bytesBehind"):
+            for term in ("kick", "vocals"):
+                asked = {"problems": {problem}, "terms": [term]}
+                self.assertEqual(self.found("--problem", problem, term), self.plain.answer(asked, "relevance", False, None), (problem, term))
+                self.assertEqual(self.found("--problem", problem, term, "--sort", "size"), self.plain.answer(asked, "size", False, None), (problem, term))
+
     def test_orders_are_gone_along_without_sorting(self):
         """What find walks along for each order is an index of the database."""
         source = (pathlib.Path(__file__).resolve().parents[2] / "tool/shared/library/QueryOrder.cpp").read_text(encoding="utf-8")
@@ -352,6 +359,11 @@ class Typed(CommandTest):
         self.assertEqual(paths("link/Bass"), ["link/Bass/Béla Bass.aif"])
         self.assertEqual(paths("shak"), [self.root + "Loops/Shaker_01.wav"])
         self.assertEqual(paths("interview"), [self.root + "Talk/Interview\\x0A2.wav"])
+        self.assertEqual(paths("Talk/", "./Loops/Bass/"), [f"./{bass}", "Talk/Interview\\x0A2.wav"])
+        with sqlite3.connect(self.index) as database:  # whatever their numbers
+            for number, name in ((2**62, "Talk/"), (-5, "Loops/Bass/")):
+                database.execute("UPDATE files SET folder = ?1 WHERE folder = (SELECT id FROM folders WHERE words = ?2)", (number, name))
+                database.execute("UPDATE folders SET id = ?1 WHERE words = ?2", (number, name))
         self.assertEqual(paths("Talk/", "./Loops/Bass/"), [f"./{bass}", "Talk/Interview\\x0A2.wav"])
 
     def test_wrong_values_are_told_with_what_is_right(self):

@@ -183,6 +183,11 @@ class Index(IndexTest):
         self.assertEqual(self.index("single/d.wav"), self.changes(added=1))
         os.unlink(self.folder / "single/d.wav")
         self.assertEqual(self.index("single/d.wav"), self.changes(removed=1))
+        self.make("hollow/f.wav")
+        self.index("hollow")
+        os.unlink(self.folder / "hollow/f.wav")
+        self.assertEqual(self.index("hollow", status=1), self.changes(problems=1))
+        self.assertEqual(self.index("hollow", "--prune"), self.changes(removed=1))
         self.failure("index", "--db", "none.db", status=2)
         self.failure("index", "lib", "--db", "no/such.db")
         self.assertFalse((self.folder / "no").exists())
@@ -212,14 +217,16 @@ class Index(IndexTest):
         self.assertEqual(self.index("lib"), self.changes(unchanged=1))
         self.assertEqual(self.index(), self.changes(unchanged=3))
         self.assertEqual(self.index("lib", "lib/a.wav", "lib/deep"), self.changes(unchanged=1), "each once")
+        self.make("single/d.wav", "single/deep/e.wav", "single/deep/f.wav")
+        self.assertEqual(self.index("single/d.wav", "single/deep/e.wav"), self.changes(added=2))
 
     @needs_mounts
     def test_volumes_that_are_not_mounted(self):
         script = f"""set -e
             index() {{ {KTFILES} index lib --db library.db --json "$@" | grep -o '"added.*removed":[0-9]*' || true; }}
-            mkdir -p lib/disk other; cp $1 lib/own.wav
+            mkdir -p lib/disk other; cp $1 lib/own.wav; cp $1 lib/gone.wav
             mount -t tmpfs none lib/disk; mkdir lib/disk/pack; cp -p $1 lib/disk/pack/a.wav
-            index; umount lib/disk; index
+            index; rm lib/gone.wav; index; umount lib/disk; index
             mount -t tmpfs none other; mkdir other/pack; cp -p lib/own.wav other/pack/a.wav
             {KTFILES} index other --db library.db -q
             umount other; rmdir lib/disk; index; index --prune"""
@@ -227,7 +234,7 @@ class Index(IndexTest):
         result = subprocess.run([*OWN_MOUNTS, "bash", "-c", script, "bash", source], cwd=self.folder, capture_output=True, text=True, timeout=60)
         counts = [[int(word.split(":")[1]) for word in line.split(",")] for line in result.stdout.splitlines()]
         # Added, changed, moved, removed; a file of the same inode, size and time on another device is another one.
-        self.assertEqual(counts, [[2, 0, 0, 0], [0, 0, 0, 0], [0, 0, 0, 0], [0, 0, 0, 1]], result)
+        self.assertEqual(counts, [[3, 0, 0, 0], [0, 0, 0, 1], [0, 0, 0, 0], [0, 0, 0, 0], [0, 0, 0, 1]], result)
         self.assertEqual(result.stderr.count("is not mounted"), 2, result.stderr)
         self.assertEqual(sorted(self.rows()), ["lib/own.wav", "other/pack/a.wav"])
 
@@ -479,6 +486,7 @@ class Watch(IndexTest):
         # Names of files that are there announce no end of writing.
         self.make("outside.wav")
         os.link(self.folder / "outside.wav", self.folder / "lib/hard.wav")
+        self.until("lib/renamed/folder/d.wav", "lib/renamed/folder/e.wav", "lib/hard.wav")
         (self.folder / "lib/soft.wav").symlink_to("../outside.wav")
         self.until("lib/renamed/folder/d.wav", "lib/renamed/folder/e.wav", "lib/hard.wav", "lib/soft.wav")
         os.unlink(self.folder / "lib/hard.wav")

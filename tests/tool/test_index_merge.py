@@ -160,27 +160,39 @@ class MergeTest(CommandTest):
 
     def test_of_what_is_of_one_time_the_later_change_wins_and_sound_over_none(self):
         ages = ["changed", "modified", "size", "inode"]
-        lines = [line("/m/a.wav", title=name, **{key: STAMP[key] + 1 for key in ages[ages.index(name):]}) for name in ages] + [line("/m/a.wav", title="least")]
-        lines += [line("/m/b.wav", title=title) for title in ("one", "two")]
-        for order in (lines, lines[::-1]):
-            self.merged(*order, db="all.db")
-            self.assertEqual([record["title"] for _, record in sorted(self.files().items())], ["changed", "two"])
-            (self.folder / "all.db").unlink()
+        for number, age in enumerate(ages):
+            newer = line("/m/a.wav", title="newer", **{age: STAMP[age] + 1}, **{key: STAMP[key] - 1 for key in ages[number + 1:]})
+            older = line("/m/a.wav", title="older, and longer")
+            for order in ((newer, older), (older, newer)):
+                self.merged(*order, db=f"{age}-{order[0] == newer}.db")
+                self.assertEqual([record["title"] for record in self.files(f"{age}-{order[0] == newer}.db").values()], ["newer"], age)
+        for order in ("one", "two"), ("two", "one"):
+            self.merged(*(line("/m/a.wav", title=title) for title in order), db=f"{order[0]}.db")
+            self.assertEqual(self.files(f"{order[0]}.db")["/m/a.wav"]["title"], "two")
         # A file that was no sound when it was looked at, and is sound now, is new.
         self.merged(line("/m/b.wav"), db="none.db")
         with sqlite3.connect(self.folder / "none.db") as database:
             database.execute("UPDATE seen SET file = NULL, changed = 5")
             database.execute("DELETE FROM files")
-        for db in ("none.db", "sound.db"):
-            self.merged(line("/m/b.wav", 6), db="sound.db")
-            self.merge({"none.db": "sound.db", "sound.db": "none.db"}[db], db=db)
+        self.merged(line("/m/b.wav", 6), db="sound.db")
+        for source, db, key in (("none.db", "sound.db", "passedOver"), ("sound.db", "none.db", "added"), ("sound.db", "none.db", "unchanged")):
+            counts = json.loads(self.merge("--jsonl", source, db=db).stdout)["counts"]
+            self.assertEqual({key: count for key, count in counts.items() if count}, {key: 1})
             self.assertEqual(list(self.files(db)), ["/m/b.wav"])
-        self.assertEqual(json.loads(self.merge("--jsonl", "sound.db", db="none.db").stdout)["counts"], {"added": 0, "changed": 0, "unchanged": 1, "passedOver": 0})
 
     def test_words_of_folders_begin_with_the_outermost_root_from_its_line_on(self):
-        self.merged("\n".join([line("/m/sub/a.wav"), '{"root":"/m/sub/"}', '{"root":"/m/"}', line("/m/sub/b.wav"), line("/x/m/c.wav"), line("/d.wav")]), db="all.db")
+        self.merged("\n".join([line("/m/sub/a.wav"), '{"root":"/m/sub/"}', '{"root":"/m/"}', line("/m/sub/b.wav"), line("/x/m/c.wav"), line("/d.wav"),
+                               '{"root":"/m/sub/"}', line("/m/sub/deep/e.wav")]), db="all.db")
         with sqlite3.connect(self.folder / "all.db") as database:
-            self.assertEqual(dict(database.execute("SELECT path, words FROM folders")), {"/m/sub/": "m/sub/", "/x/m/": "m/", "/": ""})
+            self.assertEqual(dict(database.execute("SELECT path, words FROM folders")), {"/m/sub/": "m/sub/", "/x/m/": "m/", "/": "", "/m/sub/deep/": "m/sub/deep/"})
+        for words in ("a/sub/", "b/sub/"):  # by links of one length
+            self.merged(line("/m/sub/a.wav"), db=f"{words[0]}.db")
+            with sqlite3.connect(self.folder / f"{words[0]}.db") as database:
+                database.execute("UPDATE folders SET words = ?", (words,))
+        for order in (("a.db", "b.db"), ("b.db", "a.db")):
+            self.merge(*order, db="".join(order))
+            with sqlite3.connect(self.folder / "".join(order)) as database:
+                self.assertEqual(database.execute("SELECT words FROM folders").fetchall(), [("b/sub/",)])
 
     def test_twice_is_once(self):
         self.merged("\n".join(line(f"/m/{i}.wav", title=str(i)) for i in range(50)), db="a.db")

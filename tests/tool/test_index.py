@@ -51,7 +51,8 @@ class IndexTest(CommandTest):
 
     def assert_sound(self, database="library.db"):
         self.assertEqual(self.query("PRAGMA integrity_check", database), [("ok",)])
-        self.query("INSERT INTO search(search) VALUES('integrity-check')", database)
+        self.query("INSERT INTO search(search, rank) VALUES('integrity-check', 1)", database)  # and the words are those of the files
+        self.assertEqual(self.query("SELECT count(*) FROM sqlite_schema WHERE type = 'trigger'", database), [(9,)])
         self.assertEqual(self.query("PRAGMA foreign_key_check", database), [])
         self.assertEqual(self.query("SELECT count(*) FROM files WHERE id NOT IN (SELECT file FROM seen WHERE file NOT NULL)", database), [(0,)])
 

@@ -194,6 +194,28 @@ class MergeTest(CommandTest):
             with sqlite3.connect(self.folder / "".join(order)) as database:
                 self.assertEqual(database.execute("SELECT words FROM folders").fetchall(), [("b/sub/",)])
 
+    def test_words_and_copies_of_files_that_change_in_the_transaction_that_adds_them(self):
+        record = lambda number, title, sound, **more: line(f"/m/{number}/a.wav", title=title, soundHash=sound * 64, **more)  # noqa: E731
+        self.merged(record(0, "old", "a"), db="all.db")
+        self.merged("\n".join([
+            record(1, "first", "a"), record(2, "second", "b"), record(3, "third", "b"),  # copies of one that was known, and of each other
+            record(2, "changed", "c", indexed=1_700_000_003), record(0, "later", "d", indexed=1_700_000_003),  # none of them any more
+            record(4, "fourth", "c"), record(5, "fifth", "e"), record(6, "sixth", "d"),
+            '{"root": "/m/"}', line("/m/5/b.wav"), record(7, "seventh", "e")]), db="all.db")  # a folder that has other words now
+        self.assertEqual({record["title"] for record in self.json("find", "--duplicates", "--db", "all.db")},
+                         {"changed", "later", "fourth", "fifth", "sixth", "seventh"})
+        for title in ("first", "third", "changed", "later", "sixth"):
+            self.assertEqual([record["title"] for record in self.json("find", title, "--db", "all.db")], [title])
+        for title in ("old", "second"):
+            self.assertEqual(self.json("find", title, "--db", "all.db", status=None), [])
+        with sqlite3.connect(self.folder / "all.db") as database:
+            database.execute("INSERT INTO search(search, rank) VALUES('integrity-check', 1)")
+            database.execute(f"INSERT INTO files(folder, name, size, modified, indexed, state, sound_hash) VALUES(1, 'by.wav', 1, 1, 1, 'whole', '{'b' * 64}')")
+            found = database.execute("SELECT count(*) FROM search WHERE search MATCH 'by'").fetchall() + database.execute("SELECT count(*) FROM duplicates").fetchall()
+        self.assertEqual(found, [(1,), (8,)])  # the triggers are there again
+        self.merged(record(1, "early", "a") + "\n" + record(1, "late", "b", indexed=1_700_000_003), db="new.db")  # words of which the search knows nothing yet
+        self.assertEqual([record["title"] for record in self.json("find", "late", "--db", "new.db")], ["late"])
+
     def test_twice_is_once(self):
         self.merged("\n".join(line(f"/m/{i}.wav", title=str(i)) for i in range(50)), db="a.db")
         for _ in range(2):

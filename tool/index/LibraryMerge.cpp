@@ -70,7 +70,7 @@ void LibraryMerge::finish()
 {
     if (!transaction_)
         return;
-    transaction_->commit();
+    writer_->commit(*transaction_);
     transaction_.reset();
     filesInTransaction_ = 0;
     counts_.added += pending_.added;

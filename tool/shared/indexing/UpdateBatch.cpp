@@ -35,9 +35,10 @@ void UpdateBatch::addRoots(const std::vector<std::string>& paths)
     if (paths.empty())
         return;
     SQLTransaction transaction(library_.database());
+    writer_.begin();
     for (const std::string& path : paths)
         writer_.addRoot(path);
-    transaction.commit();
+    writer_.commit(transaction);
 }
 
 void UpdateBatch::put(FileReading reading)
@@ -77,7 +78,7 @@ std::vector<ReadingJob> UpdateBatch::write()
         }
     for (const FileReading& reading : readings)
         write(reading);
-    transaction.commit();
+    writer_.commit(transaction);
     return unmoved;
 }
 
@@ -139,7 +140,7 @@ void UpdateBatch::remove(std::vector<VanishedFile> files)
             const bool wasAudio = writer_.remove(folder, nameOfIndexed(file.text));
             changes_.removed += wasAudio ? 1 : 0;
         }
-        transaction.commit();
+        writer_.commit(transaction);
     }
 }
 
@@ -148,13 +149,14 @@ void UpdateBatch::finish(const std::vector<std::string>& complete, const std::ve
     if (complete.empty() && gone.empty() && changes_.areNone())
         return;
     SQLTransaction transaction(library_.database());
+    writer_.begin();
     if (changes_.moved + changes_.removed > 0)
         writer_.removeEmptyFolders();
     for (const std::string& path : complete)
         writer_.completeRoot(writer_.addRoot(path), std::time(nullptr));
     for (const std::string& path : gone)
         writer_.removeRoot(path);
-    transaction.commit();
+    writer_.commit(transaction);
     if (!changes_.areNone())
         library_.database().run("PRAGMA optimize; PRAGMA wal_checkpoint(PASSIVE)");
 }

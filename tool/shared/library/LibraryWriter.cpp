@@ -59,6 +59,7 @@ struct Binding {
 
 LibraryWriter::LibraryWriter(Library& library)
     : library_(library),
+      added_(library.database()),
       findFile_(library.database(), "SELECT file FROM seen WHERE folder = ? AND name = ? AND file IS NOT NULL"),
       addFile_(library.database(), insertFile()),
       changeFile_(library.database(), updateFile()),
@@ -76,6 +77,18 @@ LibraryWriter::LibraryWriter(Library& library)
       findFolder_(library.database(), "SELECT id FROM folders WHERE path = ?"),
       moveFile_(library.database(), "UPDATE files SET folder = ?, name = ? WHERE id = ?")
 {
+}
+
+void LibraryWriter::begin()
+{
+    folders_.clear();
+    added_.begin();
+}
+
+void LibraryWriter::commit(SQLTransaction& transaction)
+{
+    added_.end();
+    transaction.commit();
 }
 
 std::int64_t LibraryWriter::addRoot(const std::string& path)
@@ -166,30 +179,39 @@ std::int64_t LibraryWriter::put(const LibraryRecord& record, std::int64_t folder
 {
     const std::string name = indexedName(record.place.name);
     std::int64_t file = fileAt(folder, record.place.name);
-    SQLStatement& statement = file != 0 ? changeFile_ : addFile_;
+    const bool isNew = file == 0;
+    isNew ? added_.expect() : added_.settle();
+    SQLStatement& statement = isNew ? addFile_ : changeFile_;
     statement.bind(1, folder).bind(2, std::string_view(name)).bind(3, record.stamp.size);
     statement.bind(4, record.stamp.modified).bind(5, record.indexed);
     int parameter = kFirstColumn;
     for (const LibraryColumn& column : libraryColumns())
         std::visit(Binding{statement, record, parameter++}, column.member);
-    if (file != 0)
+    if (!isNew)
         statement.bind(parameter, file);
     statement.run();
-    if (file == 0)
-        file = library_.database().lastRow();
+    if (isNew)
+        added_.note(file = library_.database().lastRow());
     see(folder, record.place.name, record.stamp, file);
-    putParts(file, record);
+    putParts(file, record, isNew);
     return file;
 }
 
-void LibraryWriter::putParts(std::int64_t file, const LibraryRecord& record)
+void LibraryWriter::removeFile(std::int64_t file)
 {
-    dropFindings_.bind(1, file).run();
+    added_.settle();
+    removeFile_.bind(1, file).run();
+}
+
+void LibraryWriter::putParts(std::int64_t file, const LibraryRecord& record, bool isNew)
+{
+    if (!isNew)
+        dropFindings_.bind(1, file).run();
     for (const LibraryProblem& problem : record.problems)
         addFinding_.bind(1, file).bind(2, std::string_view(problem.kind)).bind(3, std::string_view(problem.text)).run();
     if (record.overview)
         putOverview_.bind(1, file).bind(2, record.overview->framesPerPoint).bindBytes(3, record.overview->points).run();
-    else
+    else if (!isNew)
         dropOverview_.bind(1, file).run();
     putDetails_.bind(1, file);
     Binding{putDetails_, record, 2}(&LibraryRecord::fields);
@@ -200,7 +222,7 @@ void LibraryWriter::putParts(std::int64_t file, const LibraryRecord& record)
 void LibraryWriter::passOver(std::int64_t folder, const std::string& name, const SeenStamp& stamp)
 {
     if (const std::int64_t file = fileAt(folder, name); file != 0)
-        removeFile_.bind(1, file).run();
+        removeFile(file);
     see(folder, name, stamp, 0);
 }
 
@@ -210,6 +232,7 @@ void LibraryWriter::move(std::int64_t folder, const std::string& name, std::int6
     const std::string text = indexedName(name), newText = indexedName(newName);
     const std::int64_t file = fileAt(folder, name);
     unsee_.bind(1, folder).bind(2, std::string_view(text)).run();
+    added_.settle();
     if (file != 0)
         moveFile_.bind(1, newFolder).bind(2, std::string_view(newText)).bind(3, file).run();
     see(newFolder, newName, stamp, file);
@@ -220,7 +243,7 @@ bool LibraryWriter::remove(std::int64_t folder, const std::string& name)
     const std::string text = indexedName(name);
     const std::int64_t file = fileAt(folder, name);
     if (file != 0)
-        removeFile_.bind(1, file).run();
+        removeFile(file);
     unsee_.bind(1, folder).bind(2, std::string_view(text)).run();
     return file != 0;
 }
@@ -228,6 +251,7 @@ bool LibraryWriter::remove(std::int64_t folder, const std::string& name)
 void LibraryWriter::moveFolder(std::int64_t folder, const std::string& path, const std::string& words)
 {
     const std::string text = indexedName(path), shown = indexedName(words);
+    added_.settle();
     SQLStatement(library_.database(), "UPDATE folders SET path = ?, words = ? WHERE id = ?")
         .bind(1, std::string_view(text))
         .bind(2, std::string_view(shown))

@@ -1,6 +1,7 @@
 // Changes the rows of an index.
 #pragma once
 
+#include "tool/shared/library/AddedFiles.h"
 #include "tool/shared/library/Library.h"
 
 #include <string>
@@ -11,9 +12,11 @@ class LibraryWriter {
 public:
     explicit LibraryWriter(Library& library);
 
-    /// Call at the beginning of each transaction but the first: forgets which rows the folders have, as another program
-    /// may have removed some.
-    void begin() { folders_.clear(); }
+    /// Call at the beginning of each transaction: forgets which rows the folders have, as another program may have
+    /// removed some.
+    void begin();
+    /// In the place of the transaction's own: the words of files that were added are written here.
+    void commit(SQLTransaction& transaction);
 
     /// The row of a root, which is added if it is new. `path` ends with a slash.
     std::int64_t addRoot(const std::string& path);
@@ -48,9 +51,11 @@ private:
     /// The audio file of a place; 0 for none.
     std::int64_t fileAt(std::int64_t folder, const std::string& name);
     void see(std::int64_t folder, const std::string& name, const SeenStamp& stamp, std::int64_t file);
-    void putParts(std::int64_t file, const LibraryRecord& record);
+    void removeFile(std::int64_t file);
+    void putParts(std::int64_t file, const LibraryRecord& record, bool isNew);
 
     Library& library_;
+    AddedFiles added_;
     SQLStatement findFile_, addFile_, changeFile_, removeFile_, see_, unsee_;
     SQLStatement dropFindings_, addFinding_, putOverview_, dropOverview_, putDetails_;
     SQLStatement addFolder_, findFolder_, moveFile_;

@@ -169,9 +169,12 @@ class Index(IndexTest):
         self.assertEqual(self.index("lib"), self.changes(removed=1, unchanged=1))
         self.assertEqual(sorted(self.rows()), ["lib/a.wav", "more/c.wav"])
         os.rename(self.folder / "more", self.folder / "elsewhere")
+        with sqlite3.connect(self.folder / "library.db") as database:
+            database.execute("UPDATE roots SET completed = 1")
         for arguments in (("more",), (), ("lib", "more")):
             self.assertEqual(self.index(*arguments, status=1)["removed"], 0)
             self.assertRegex(self.told[0], "more: is not there; .* kept")
+        self.assertEqual(self.query("SELECT substr(path, -5), completed > 1 FROM roots ORDER BY path"), [("/lib/", 1), ("more/", 0)])
         (self.folder / "more").mkdir()
         self.index(status=1)
         self.assertRegex(self.told[0], "more: is empty, .* kept")

@@ -377,6 +377,8 @@ class IndexRecords(CommandTest):
                     failed += 1
                     self.assertTrue(any(problem["text"] for problem in record["problems"]), (name, number, record))
             self.assertGreater(failed, 0, name)
+        shutil.copy(self.folder / "loop.wav", self.folder / "nameless")  # is audio though nothing but its beginning says so
+        self.assertEqual({self.failing("nameless", f"{number}+")["state"] for number in range(1, 9)}, {"unreadable", "damaged"})
 
     def failing(self, name, which):
         """The record that is made when those reads of the file fail, as strace counts them. None: there are not so many."""

@@ -73,6 +73,7 @@ class Plain:
             "rate": lambda rate: row["sample_rate"] == rate,
             "channels": lambda number: row["channels"] == number,
             "containers": lambda names: row["container_name"] in names,
+            "coding": lambda name: row["coding"] == name,
             "problems": lambda kinds: bool(self.problems.get(row["id"], set()) & kinds),
             "any_problem": lambda _: row["state"] != "whole" or row["id"] in self.problems,
             "copied": lambda _: row["sound_hash"] in self.copied,
@@ -108,7 +109,7 @@ class Questions:
         def add(name, value, *words):
             asked[name] = value
             typed.extend(words)
-        parts = ["scope", "terms", "tempos", "keys", "kind", "category", "genre", "artist", "seconds", "rate", "channels", "containers", "problems", "any_problem", "copied", "since"]
+        parts = ["scope", "terms", "tempos", "keys", "kind", "category", "genre", "artist", "seconds", "rate", "channels", "containers", "coding", "problems", "any_problem", "copied", "since"]
         for part in pick.sample(parts, pick.choice([0, 1, 1, 1, 2, 2, 3])):
             if part == "scope":
                 path = sample["folder_path"]
@@ -148,10 +149,12 @@ class Questions:
                 add("rate", rate, "--rate", f"{rate / 1000:g}k")
             elif part == "channels":
                 add("channels", 2, "--channels", "2")
-            elif part == "containers":
+            elif part == "containers" and "coding" not in asked:
                 name, names = pick.choice([("wav", {"WAVE", "RF64", "BW64"}), ("aiff", {"AIFF", "AIFC"}), ("mp3", {"MP3"}), ("rf64", {"RF64"})])
                 add("containers", names, "--format", name)
-            elif part == "problems":
+            elif part == "coding" and "containers" not in asked:
+                add("coding", "Opus", "--format", "opus")
+            elif part == "problems" and "any_problem" not in asked:
                 name, kinds = pick.choice([("truncated", {"soundIsCut", "containerIsCut", "chunkIsCut"}), ("unreadable", {"unreadable"}), ("padIsMissing", {"padIsMissing"})])
                 add("problems", kinds, "--problem", name)
             elif part == "any_problem" and "problems" not in asked:
@@ -181,6 +184,8 @@ class AgainstAPlainFilter(CommandTest):
         cls.addClassCleanup(cls.home.cleanup)
         cls.index = os.path.join(cls.home.name, "library.db")
         library_rows.fill(cls.index, 12000, seed=5)
+        with sqlite3.connect(cls.index) as database:
+            database.execute("UPDATE files SET coding = 'Opus' WHERE id % 3 = 0")
         cls.plain = Plain(cls.index)
 
     def found(self, *typed, **options):

@@ -17,8 +17,6 @@ public:
 
     SQLDatabase& database() { return database_; }
     const std::string& path() const { return database_.path(); }
-    /// A number that differs when another connection has changed the index.
-    std::int64_t dataVersion() { return database_.number("PRAGMA data_version"); }
 
 private:
     SQLDatabase database_;

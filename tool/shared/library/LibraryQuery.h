@@ -47,7 +47,8 @@ struct LibraryQuery {
     std::string title;
     std::string album;
     std::string kind;                    // as in a record
-    std::vector<std::string> containers; // names as in records
+    std::vector<std::string> containers; // of one of these; names as in records
+    std::vector<std::string> codings;    // or so coded
     std::optional<NumberRange> seconds;
     std::optional<NumberRange> sampleRate;
     std::optional<NumberRange> channels;

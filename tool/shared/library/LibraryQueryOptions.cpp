@@ -46,6 +46,7 @@ Argument addValue(Verb& verb, const std::string& name, const std::string& label,
 struct Choice {
     std::string_view word;
     std::vector<std::string> meant;
+    bool isCoding = false; // else a container
 };
 
 const Choice* choiceOf(std::span<const Choice> choices, const std::string& text)
@@ -120,7 +121,10 @@ std::span<const Choice> formatChoices()
                                                 {"dsf", {"DSF"}},
                                                 {"dff", {"DFF"}},
                                                 {"voc", {"VOC"}},
-                                                {"amr", {"AMR"}}};
+                                                {"amr", {"AMR"}},
+                                                {"opus", {"Opus"}, true},
+                                                {"vorbis", {"Vorbis"}, true},
+                                                {"alac", {"ALAC"}, true}};
     return choices;
 }
 
@@ -225,9 +229,10 @@ void addSoundOptions(Verb& verb, LibraryQuery& query)
         [&](NumberRange range) { query.channels = range; }, "Of so many channels, or in a range: 2, 3..",
         "number of channels: 2, or 3.. is one");
     addChoice(
-        verb, "--format", "FORMAT", formatChoices(), [&](const Choice& choice) { query.containers = choice.meant; },
-        "wav, aiff, caf, mp3, m4a, flac, ogg, and others", "format",
-        "wav, aiff, aifc, caf, mp3, aac, m4a, flac, ogg, wma, wavpack, w64 are some");
+        verb, "--format", "FORMAT", formatChoices(),
+        [&](const Choice& choice) { (choice.isCoding ? query.codings : query.containers) = choice.meant; },
+        "wav, aiff, caf, mp3, m4a, flac, ogg, opus, and others", "format",
+        "wav, aiff, aifc, caf, mp3, aac, m4a, flac, ogg, opus, wma, wavpack, w64 are some");
     addChoice(
         verb, "--problem", "KIND", problemChoices(),
         [&](const Choice& choice) {

@@ -67,8 +67,9 @@ public:
         };
         const std::string_view kind = take(), container = take(), channels = take(), rate = take();
         const auto& containers = query_.containers;
+        const bool isAnyContainer = containers.empty() || !query_.codings.empty();
         return (query_.kind.empty() || kind == query_.kind) &&
-               (containers.empty() || std::ranges::find(containers, container) != containers.end()) &&
+               (isAnyContainer || std::ranges::find(containers, container) != containers.end()) &&
                isWithin(query_.channels, channels) && isWithin(query_.sampleRate, rate);
     }
 
@@ -246,17 +247,20 @@ void QueryConditions::addScopes(SQLDatabase& database, const LibraryQuery& query
     selections_.push_back(selection);
 }
 
-// Goes from form to form along the index, which goes on with durations, and takes the rows of those that pass.
+// Goes from form to form along the index, which goes on with durations, and takes the rows of those that pass. Codings
+// are no part of a form.
 void QueryConditions::addForms(const LibraryQuery& query)
 {
     const bool asksForForm = !query.kind.empty() || !query.containers.empty() || query.channels || query.sampleRate;
     if (!query.kind.empty())
         require({"f.kind = ?", {query.kind}});
-    SQLText containers;
+    SQLText formats;
     for (const std::string& name : query.containers)
-        containers.append({"f.container_name = ?", {name}}, " OR ");
-    if (!query.containers.empty())
-        require({"(" + containers.sql + ")", containers.parameters});
+        formats.append({"f.container_name = ?", {name}}, " OR ");
+    for (const std::string& name : query.codings)
+        formats.append({"f.coding = ?", {name}}, " OR ");
+    if (!formats.sql.empty())
+        require({"(" + formats.sql + ")", formats.parameters});
     if (query.channels)
         require(within("f.channels", *query.channels));
     if (query.sampleRate)

@@ -120,11 +120,6 @@ std::int64_t SQLDatabase::lastRow() const
     return sqlite3_last_insert_rowid(handle());
 }
 
-std::int64_t SQLDatabase::changes() const
-{
-    return sqlite3_changes64(handle());
-}
-
 void SQLStatement::Finalizing::operator()(sqlite3_stmt* statement) const
 {
     sqlite3_finalize(statement);

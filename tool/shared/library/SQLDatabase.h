@@ -29,8 +29,6 @@ public:
     /// The integer of the first row of a query; 0 without a row.
     std::int64_t number(const std::string& sql);
     std::int64_t lastRow() const;
-    /// The rows that the last statement changed.
-    std::int64_t changes() const;
     const std::string& path() const { return path_; }
     sqlite3* handle() const { return handle_.get(); }
 

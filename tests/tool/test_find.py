@@ -377,7 +377,7 @@ class Typed(CommandTest):
                  ("--rate", "fast"): "48k", ("--channels", "two"): "number of channels", ("--longer", "-1"): "500ms", ("--shorter", "1:75"): "500ms", ("--since", "2026-02-30"): "2026-11-01",
                  ("--since", "2026-13-01"): "yesterday", ("--since", "tomorrow"): "yesterday", ("--since", "2026-01-01T24:00"): "yesterday", ("--since", "2026-01-01T12:00:60"): "yesterday", ("--since", "99999999999d"): "yesterday",
                  ("--since", "2026-01-01T"): "yesterday", ("--since", "2026-01-01T12"): "yesterday", ("--limit", "-1"): "--limit", ("--related",): "--key or --tempo",
-                 ("--longer", "3", "--shorter", "2"): "--longer", ("--sort", "relevance"): "words", ("--json",): "-0"}
+                 ("--limit", "1", "--limit", "2"): "--limit is given more than once", ("--longer", "3", "--shorter", "2"): "--longer", ("--sort", "relevance"): "words", ("--json",): "-0"}
         for typed, told in cases.items():
             with self.subTest(typed):
                 self.assertIn(told, self.failure("find", "--db", self.index, "-0", *typed, status=2))

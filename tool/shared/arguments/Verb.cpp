@@ -31,6 +31,13 @@ CLI::Option* unguarding(CLI::Option* option, TextCheck check = {})
     return option->transform(CLI::Validator(unguard, ""));
 }
 
+// The parser counts what it "required".
+std::string inWords(const std::string& problem)
+{
+    const std::size_t end = problem.find(": At Most 1 required but received");
+    return end == problem.npos ? problem : problem.substr(0, end) + " is given more than once";
+}
+
 // The option group of words for another program, which follow "--".
 constexpr const char* kWordsGroup = "Words";
 
@@ -216,7 +223,7 @@ Verb::Request Verb::parse(const std::vector<std::string>& arguments)
     } catch (const CLI::CallForVersion& version) {
         return {nullptr, version.what() + std::string("\n")};
     } catch (const CLI::ParseError& error) {
-        throw UsageError(error.what());
+        throw UsageError(inWords(error.what()));
     }
     const Verb* verb = this;
     while (!verb->app_->get_subcommands().empty())

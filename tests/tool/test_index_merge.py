@@ -100,6 +100,7 @@ class MergeTest(CommandTest):
             "cut points": bad(overview={"framesPerPoint": 256, "points": "AAA"}),
             "fields": bad(fields={}), "fields without names": bad(fields=[{"value": 1}]), "tags": bad(loopTags=[]), "problems": bad(problems=[{"kind": "x"}]),
             "a root": '{"root": "m/"}', "a root without end": '{"root": "/m"}', "deep": "[" * 1_000_000,
+            "fields too deep for SQLite": bad(fields=[{"name": "n", "value": "deep"}]).replace('"deep"', "[" * 5000 + "]" * 5000),
         }
         self.merge("-", stdin=good.encode())
         before = self.export()
@@ -245,9 +246,12 @@ class MergeTest(CommandTest):
         for name, change in (("relative", "UPDATE folders SET path = 'm/', words = 'm/'"), ("dots", "UPDATE seen SET name = '..'"),
                              ("words", "UPDATE folders SET words = '../'"), ("number", "UPDATE files SET frames = -5"),
                              ("text", "UPDATE files SET title = CAST(x'ff' AS TEXT)"), ("points", "INSERT OR REPLACE INTO overviews VALUES(1, 256, zeroblob(1000001))"),
-                             ("future", "UPDATE files SET indexed = 1 << 40")):
+                             ("future", "UPDATE files SET indexed = 1 << 40"), ("fields", "UPDATE details SET fields = 'x'"),
+                             ("fields of two lines", "UPDATE details SET fields = '[]' || char(10)"), ("no fields", "UPDATE details SET fields = '[1]'"),
+                             ("fields without names", "UPDATE details SET fields = '[{\"name\":1,\"value\":1}]'"), ("bytes", "UPDATE details SET fields = '[]' || char(0) || 'x'"),
+                             ("tags", "UPDATE details SET tags = '{}}'"), ("no tags", "UPDATE details SET tags = '[]'")):
             with self.subTest(name):
-                self.merged(line("/m/a.wav"), db=f"{name}.db")
+                self.merged(line("/m/a.wav", fields=[{"name": "n", "value": None}]), db=f"{name}.db")
                 with sqlite3.connect(self.folder / f"{name}.db") as database:
                     database.execute(change)
                 self.merge(f"{name}.db", db="target.db", status=1)

@@ -14,6 +14,17 @@ constexpr int kFilesPerTransaction = 1'000;
 
 constexpr std::int64_t kNanoseconds = 1'000'000'000;
 
+// Whether fields and tags are JSON as SQLite reads it, in which they are nested less deep than elsewhere, of the shape
+// that the views of the index take apart.
+constexpr const char* kAreDetails = R"(SELECT
+    CASE WHEN ?1 = '' THEN 1
+         WHEN NOT json_valid(?1) OR json_type(?1) <> 'array' THEN 0
+         ELSE NOT EXISTS (SELECT 1 FROM json_each(?1) WHERE type <> 'object'
+                          OR json_type(value, '$.name') IS NOT 'text' OR json_type(value, '$.value') IS NULL) END,
+    CASE WHEN ?2 = '' THEN 1
+         WHEN NOT json_valid(?2) THEN 0
+         ELSE json_type(?2) = 'object' END)";
+
 // How new something is. A file that is no audio has no time of reading: it was looked at after it changed.
 auto ageOf(const SeenStamp& stamp, std::int64_t indexed, bool isAudio)
 {
@@ -48,7 +59,8 @@ LibraryMerge::LibraryMerge(Library& target)
       writer_(std::in_place, target),
       known_(target),
       completed_(target.database(), "UPDATE roots SET completed = ?1 WHERE id = ?2 AND coalesce(completed, 0) < ?1"),
-      folderWords_(target.database(), "SELECT words FROM folders WHERE id = ?")
+      folderWords_(target.database(), "SELECT words FROM folders WHERE id = ?"),
+      areDetails_(target.database(), kAreDetails)
 {
 }
 
@@ -120,9 +132,22 @@ std::int64_t LibraryMerge::folder(const std::string& path, const std::string& wo
     return row;
 }
 
+void LibraryMerge::requireDetails(const LibraryRecord& record)
+{
+    constexpr std::string_view ends("\n\0", 2); // of a line of an export, and of what SQLite looks at
+    if (record.fields.find_first_of(ends) != std::string::npos || record.tags.find_first_of(ends) != std::string::npos)
+        throw Failure("fields and tags stand on more than one line");
+    areDetails_.bind(1, std::string_view(record.fields)).bind(2, std::string_view(record.tags)).step();
+    const bool areFields = areDetails_.number(0) != 0, areTags = areDetails_.number(1) != 0;
+    areDetails_.reset();
+    if (!areFields || !areTags)
+        throw Failure(areFields ? "tags cannot be what it says" : "fields cannot be what it says");
+}
+
 void LibraryMerge::put(const LibraryRecord& record, const std::string& words, bool isNew)
 {
     requireSound(record);
+    requireDetails(record);
     writer_->put(record, folder(record.place.folder, words));
     ++(isNew ? pending_.added : pending_.changed);
 }

@@ -44,11 +44,12 @@ private:
     void endOfFile();
     std::int64_t folder(const std::string& path, const std::string& words);
     void put(const LibraryRecord& record, const std::string& words, bool isNew);
+    void requireDetails(const LibraryRecord& record);
 
     Library& target_;
     std::optional<LibraryWriter> writer_; // another one once something was undone that it remembers
     RecordReader known_;
-    SQLStatement completed_, folderWords_;
+    SQLStatement completed_, folderWords_, areDetails_;
     std::optional<SQLTransaction> transaction_;
     int filesInTransaction_ = 0;
     MergeCounts counts_;

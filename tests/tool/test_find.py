@@ -374,7 +374,7 @@ class Typed(CommandTest):
     def test_wrong_values_are_told_with_what_is_right(self):
         cases = {("--tempo", "fast"): "118..122", ("--tempo", "122..118"): "118..122", ("--tempo", ".."): "118..122", ("--key", "H"): "F# minor", ("--key", ""): "F# minor",
                  ("--kind", "lop"): 'did you mean "loop"?', ("--format", "flacc"): 'did you mean "flac"?', ("--problem", "truncate"): 'did you mean "truncated"?', ("--sort", "temop"): 'did you mean "tempo"?',
-                 ("--rate", "fast"): "48k", ("--channels", "two"): "number of channels", ("--longer", "-1"): "500ms", ("--shorter", "1:75"): "500ms", ("--since", "2026-02-30"): "2026-11-01",
+                 ("--rate", "fast"): "48k", ("--channels", "two"): "number of channels", ("--longer", "-1"): "500ms", ("--longer", "9" * 308 + "h"): "500ms", ("--rate", "9" * 308): "48k", ("--shorter", "1:75"): "500ms", ("--since", "2026-02-30"): "2026-11-01",
                  ("--since", "2026-13-01"): "yesterday", ("--since", "tomorrow"): "yesterday", ("--since", "2026-01-01T24:00"): "yesterday", ("--since", "2026-01-01T12:00:60"): "yesterday", ("--since", "99999999999d"): "yesterday",
                  ("--since", "2026-01-01T"): "yesterday", ("--since", "2026-01-01T12"): "yesterday", ("--limit", "-1"): "--limit", ("--related",): "--key or --tempo",
                  ("--limit", "1", "--limit", "2"): "--limit is given more than once", ("--longer", "3", "--shorter", "2"): "--longer", ("--sort", "relevance"): "words", ("--json",): "-0"}

@@ -31,6 +31,11 @@ struct Unit {
     double factor;
 };
 
+std::optional<double> ifFinite(double number)
+{
+    return std::isfinite(number) ? std::optional(number) : std::nullopt;
+}
+
 // The longest name that ends the text counts.
 std::optional<double> numberWithUnit(std::string_view text, std::span<const Unit> units)
 {
@@ -39,7 +44,7 @@ std::optional<double> numberWithUnit(std::string_view text, std::span<const Unit
         if (lowered.ends_with(unit.name))
             if (const auto number = plainNumberFromText(
                     withoutPadding(std::string_view(lowered).substr(0, lowered.size() - unit.name.size()))))
-                return *number * unit.factor;
+                return ifFinite(*number * unit.factor);
     return std::nullopt;
 }
 
@@ -141,7 +146,7 @@ std::optional<double> rateFromText(std::string_view text)
     constexpr Unit kUnits[] = {{"khz", 1000}, {"k", 1000}, {"hz", 1}, {"", 1}};
     const auto rate = numberWithUnit(text, kUnits);
     // 44.1 thousands are whole Hz although their product is not quite.
-    return rate ? std::optional(std::round(*rate * 1000) / 1000) : std::nullopt;
+    return rate ? ifFinite(std::round(*rate * 1000) / 1000) : std::nullopt;
 }
 
 std::optional<NumberRange> rangeFromText(std::string_view text, const NumberReader& read)

@@ -1,0 +1,15 @@
+# kt_add_command_sources(PREFIX): to the targets PREFIX_NAME of parsers that belong to the command and not to a room, their sources.
+function(kt_add_command_sources prefix)
+    find_package(fmt REQUIRED)
+    find_package(nlohmann_json REQUIRED)
+    set(xmltext meta/XMLText.cpp)
+    set(libraryrecord shared/library/LibraryRecordJson.cpp shared/library/LibraryRecordCheck.cpp shared/library/LibraryRecord.cpp
+                      shared/library/IndexedName.cpp)
+    set(querytexts shared/library/KeyText.cpp shared/library/QueryValues.cpp shared/output/ClockTime.cpp)
+    foreach(name xmltext libraryrecord querytexts)
+        list(TRANSFORM ${name} PREPEND ${PROJECT_SOURCE_DIR}/tool/)
+        target_sources(${prefix}_${name} PRIVATE ${${name}})
+        target_include_directories(${prefix}_${name} PRIVATE ${PROJECT_SOURCE_DIR})
+        target_link_libraries(${prefix}_${name} PRIVATE fmt::fmt nlohmann_json::nlohmann_json)
+    endforeach()
+endfunction()

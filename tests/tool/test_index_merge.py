@@ -257,6 +257,23 @@ class MergeTest(CommandTest):
                 self.merge(f"{name}.db", db="target.db", status=1)
                 self.assertEqual(self.files("target.db"), {})
 
+    def test_an_index_that_is_damaged_in_the_middle_is_told_by_whoever_reads_it_and_spoils_no_other(self):
+        self.merged("\n".join(line(f"/m/{i:05}.wav", title="t" * 200) for i in range(3000)), db="a.db")
+        with open(self.folder / "a.db", "r+b") as file:
+            size = os.path.getsize(file.name)
+            file.seek(size // 2)
+            file.write(b"\xff" * (size // 4))
+        self.write("b.jsonl", line("/m/b.wav").encode())
+        self.assertIn("a.db: the index is damaged", self.merge("a.db", "b.jsonl", status=1).stderr.decode())
+        self.assertIn("/m/b.wav", self.files())
+        for arguments in (("find", "--sort", "size"), ("page", "-o", "page.html")):
+            self.assertIn("the index is damaged", self.failure(*arguments, "--db", "a.db"), arguments)
+        for arguments in (("index", "export"), ("find",)):  # what was read before is told too
+            *good, bad = self.json(*arguments, "--db", "a.db", status=1)
+            self.assertEqual((len(good) > 10, bad["path"], "damaged" in bad["error"]), (True, "a.db", True))
+            self.assertEqual(list(map(json.loads, self.lines(*arguments, "--db", "a.db", "--jsonl", status=1)))[-1], bad)
+        self.assertIn("damaged", self.lines("find", "--csv", "--db", "a.db", status=1)[-1])
+
     def test_a_kill_in_the_middle_leaves_whole_records_and_the_next_merge_ends_it(self):
         self.merged("\n".join(line(f"/m/{i:05}.wav", title="t" * 200, fields=[{"name": "x", "value": "y"}]) for i in range(12_000)), db="a.db")
         whole = self.export("a.db")

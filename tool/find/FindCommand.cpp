@@ -42,9 +42,9 @@ void bringUpToDate(const std::string& path, const LibraryQuery& query, bool quie
 }
 
 /// Returns whether a file was found.
-bool findFiles(const FindArguments& arguments, const std::string& path, const OutputOptions& options)
+bool findFiles(const FindArguments& arguments, const std::string& path, const OutputOptions& options,
+               FindReport& report)
 {
-    FindReport report(options, arguments.query, arguments.endsWithNul ? PathEnd::nul : PathEnd::line);
     LibraryQuery query = arguments.query;
     if (report.form() == Form::none)
         query.limit = 1;
@@ -74,7 +74,15 @@ bool runFind(FindArguments& arguments, const OutputOptions& options)
     settleWords(arguments.query);
     const std::string path = arguments.database.empty() ? defaultLibrary() : arguments.database;
     bool isFound = false;
-    const bool isGood = reportingRecord(path, options, [&] { isFound = findFiles(arguments, path, options); });
+    FindReport report(options, arguments.query, arguments.endsWithNul ? PathEnd::nul : PathEnd::line);
+    const bool isGood = reportingFailures(path, [&] {
+        try {
+            isFound = findFiles(arguments, path, options, report);
+        } catch (const Failure& failure) { // of what was found before, all stays
+            report.fail(path, failure.what());
+            throw;
+        }
+    });
     return isGood && isFound;
 }
 

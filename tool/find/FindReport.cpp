@@ -135,6 +135,12 @@ void FindReport::add(const LibraryRecord& record)
     }
 }
 
+void FindReport::fail(const std::string& path, const std::string& text)
+{
+    records_.addFailure(path, text);
+    records_.finish();
+}
+
 void FindReport::addRow(const LibraryRecord& record)
 {
     if (std::exchange(isFirst_, false))

@@ -21,6 +21,8 @@ public:
     LibraryParts parts() const;
     void add(const LibraryRecord& record);
     void finish() { records_.finish(); }
+    /// In the place of `finish` where the index could not be read to its end.
+    void fail(const std::string& path, const std::string& text);
 
 private:
     void addRow(const LibraryRecord& record);

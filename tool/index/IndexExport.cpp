@@ -23,7 +23,8 @@ void writeAll(Library& library, JsonRecords& records)
     RecordReader reader(library);
     IndexedFiles files(library, IndexedFiles::Which::audio);
     while (const auto file = files.next()) {
-        writeLibraryRecord(records.begin(), reader.record(*file));
+        const LibraryRecord record = reader.record(*file); // whole, before any of it is written
+        writeLibraryRecord(records.begin(), record);
         records.end();
         if (Output::standard().failed())
             return;
@@ -35,12 +36,18 @@ bool runExport(const std::string& named, OutputOptions options)
     const std::string path = named.empty() ? defaultLibrary() : named;
     if (!options.wantsJson())
         options.json = JsonShape::lines;
-    return reportingFailures(path, [&] {
-        Library library(path, SQLDatabase::Mode::read);
-        JsonRecords records(options);
-        writeAll(library, records);
-        records.finish();
+    JsonRecords records(options);
+    const bool isGood = reportingFailures(path, [&] {
+        try {
+            Library library(path, SQLDatabase::Mode::read);
+            writeAll(library, records);
+        } catch (const Failure& failure) {
+            records.addFailure(path, failure.what());
+            throw;
+        }
     });
+    records.finish();
+    return isGood;
 }
 
 } // namespace

@@ -217,12 +217,12 @@ class AgainstAPlainFilter(CommandTest):
         for terms in (['"bongo'], ['loop"s'], ["NOT bongo"], ["bongo OR"], ["kick*"], ["name:kick"], ["^kick"], ["-kick"], ["(kick)"], ["kick NEAR"], ["kick", "AND", "wav"]):
             self.assertEqual(self.found("--", *terms), self.plain.answer({"terms": terms}, "relevance", False, None), terms)
 
-    def test_rare_problems_and_words_that_stand_in_one_part_of_the_index(self):
-        for problem in ("padIsMissing", "soundIsCut", "bytesBehind"):
-            for term in ("kick", "vocals"):
-                asked = {"problems": {problem}, "terms": [term]}
-                self.assertEqual(self.found("--problem", problem, term), self.plain.answer(asked, "relevance", False, None), (problem, term))
-                self.assertEqual(self.found("--problem", problem, term, "--sort", "size"), self.plain.answer(asked, "size", False, None), (problem, term))
+    def test_rare_rows_and_words_that_stand_in_one_part_of_the_index(self):
+        for typed, asked in ((("--format", "rf64"), {"containers": {"RF64"}}), (("--problem", "any"), {"any_problem": True})):
+            for term in ("kick", "vocals", "take"):
+                for order in ("relevance", "size"):
+                    expected = self.plain.answer({**asked, "terms": [term]}, order, False, None)
+                    self.assertEqual(self.found(*typed, term, "--sort", order), expected, (typed, term, order))
 
     def test_orders_are_gone_along_without_sorting(self):
         """What find walks along for each order is an index of the database."""
@@ -312,6 +312,9 @@ class Typed(CommandTest):
                 with self.subTest(f"{option} {value}"):
                     self.assertEqual("".join(sorted(self.find(option, value))), expected)
         self.assertEqual(self.find("--longer", "2", "--shorter", "2"), "S")
+        with sqlite3.connect(self.index) as database:  # damaged, and nothing says how
+            database.execute("UPDATE files SET state = 'damaged' WHERE name LIKE 'Shaker%'")
+        self.assertEqual("".join(sorted(self.find("--problem", "any"))), "IS")
 
     def test_dates_and_days_are_those_of_the_local_clock(self):
         hours = (12 - time.gmtime(self.now).tm_hour) or 1  # there it is about noon, and never UTC

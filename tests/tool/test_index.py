@@ -212,6 +212,8 @@ class Index(IndexTest):
         self.assertEqual(self.index("lib", status=1), self.changes(unchanged=1, problems=1))
         self.assertRegex(self.told[0], r"lib/a\.wav: .*leads nowhere")
         self.assertEqual(sorted(self.rows()), ["lib/a.wav", "lib/b.wav"])
+        self.index("lib/a.wav", status=None)
+        self.assertEqual(sorted(self.rows()), ["lib/a.wav", "lib/b.wav"])
         (self.folder / "lib/volume/a.wav").mkdir(parents=True)  # to a folder, it is no file any more
         self.assertEqual(self.index("lib"), self.changes(removed=1, unchanged=1))
 

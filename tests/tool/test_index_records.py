@@ -176,9 +176,13 @@ class IndexRecords(CommandTest):
         self.write("lib/loop.wav", wave(acid(flags=2, root=60, beats=8, tempo=120), tag, frames=192000))
         self.write("lib/shot.wav", wave(acid(flags=1), tag))
         self.write("lib/take.wav", wave(bext(b"Scene 1", b"Recorder", b"2026-11-23"), info(INAM=b"of the list", ICMT=b"\xc4 comment")))
+        cart = chunk(b"cart", b"0101" + b"of the cart".ljust(2044, b"\0"))
+        self.write("lib/cart.wav", wave(cart, info(INAM=b"of the list")))
+        self.write("lib/blank.wav", wave(cart, info(INAM=b" ")))
         shutil.copy(MEDIA / "bassline.aiff", self.folder / "lib")
         records = self.records("--no-overview")
         expected = {
+            "cart.wav": dict(title="of the list"), "blank.wav": dict(title="of the cart"),
             "loop.wav": dict(kind="loop", tempo=120, tempoSource="acid", keyNote=0, key="C", keySource="acid", title="of the tag", artist="Somebody",
                              album="Album", recorded="1999", beatCount=8),
             "shot.wav": dict(kind="one-shot", tempo=70, tempoSource="id3.TBPM", keyNote=9, key="A minor", mode="minor", keySource="id3.TKEY"),

@@ -533,6 +533,7 @@ class Watch(IndexTest):
         self.assertRegex(process.stderr.readline().decode(), "watches no more folders")
         self.make("lib/b.wav")
         self.until("lib/a.wav", "lib/b.wav")
+        self.assertEqual(json.loads(process.stdout.readline())["counts"]["added"], 1)  # told before the pipe is closed, which would end it while its folder is removed
 
 
 if __name__ == "__main__":

@@ -89,6 +89,21 @@ class Scan(CommandTest):
                 resource.setrlimit(resource.RLIMIT_STACK, (stack, stack))
             self.assertEqual(self.paths("lib", "--threads", "16", preexec_fn=limit), expected, stack)
 
+    @unittest.skipIf(INSTRUMENTED, "an instrumented program reserves more memory than that")
+    def test_want_of_memory_ends_in_order(self):
+        (self.folder / "lib").mkdir(exist_ok=True)
+        for number in range(20_000):
+            self.write(f"lib/{number:05}{'x' * 220}", b"")
+        told = set()
+        for megabytes in range(40, 141, 10):
+            def limit(bytes=megabytes << 20):
+                resource.setrlimit(resource.RLIMIT_AS, (bytes, bytes))
+            for verb in ("scan", "info"):
+                result = subprocess.run([KTFILES, verb, "lib", "-j", "2", "-q"], cwd=self.folder, capture_output=True, text=True, preexec_fn=limit, timeout=60)
+                self.assertIn(result.returncode, (0, 1, 127), (verb, megabytes, result.stderr))  # 127: the system cannot load the command
+                told.add(result.stderr)
+        self.assertIn("ktfiles: error: out of memory\n", told)
+
     NASTY = "a\x1b[31m\x7f\u009b31m\u202egnp\u200b\u2028\U000e0041é"
 
     def test_a_terminal_is_sent_no_commands_and_no_hidden_characters(self):

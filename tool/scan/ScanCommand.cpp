@@ -9,6 +9,7 @@
 #include "tool/shared/threads/OrderedWork.h"
 
 #include <algorithm>
+#include <exception>
 #include <unistd.h>
 
 namespace {
@@ -54,8 +55,11 @@ void countInto(FilesProgress& progress, const std::vector<std::string>& folders,
         ++files;
         return !stop.stop_requested();
     });
-    if (walk.run())
-        progress.setTotal(files);
+    try {
+        if (walk.run())
+            progress.setTotal(files);
+    } catch (const std::exception&) { // the work meets it too, and tells
+    }
 }
 
 // Writes results in order, and keeps the bad files for a list at the end.
@@ -113,15 +117,23 @@ void scanByThreads(const std::vector<std::string>& folders, unsigned threads,
 {
     ScanWork work(threads, std::size_t{threads} * kBatchesPerThread, scan);
     const std::jthread walker = startedThread([&] {
-        walkBatches(folders, [&](Batch batch) { return work.give(std::move(batch)); });
-        work.close();
+        try {
+            walkBatches(folders, [&](Batch batch) { return work.give(std::move(batch)); });
+            work.close();
+        } catch (...) {
+            work.fail(std::current_exception());
+        }
     });
     if (!walker.joinable()) // the walker and the taker of results must be different threads
         return scanHere(folders, scan, results);
+    // Declared so as to run before the wait for the walker, even if memory is short.
+    struct Stopping {
+        ScanWork& stopped;
+        ~Stopping() { stopped.stop(); }
+    } const stopping{work};
     while (auto records = work.take())
         if (!results.add(std::move(*records)))
             break;
-    work.stop();
 }
 
 bool runScan(const ScanArguments& arguments, const OutputOptions& options)

@@ -68,8 +68,12 @@ private:
         OrderedWork<FoundFile, Answer> work(threads, std::size_t{threads} * kFilesPerThread,
                                             [this](const FoundFile& file) { return answerFor(file); });
         const std::jthread walker = startedThread([&] {
-            walk([&](FoundFile file) { return work.give(std::move(file)); });
-            work.close();
+            try {
+                walk([&](FoundFile file) { return work.give(std::move(file)); });
+                work.close();
+            } catch (...) {
+                work.fail(std::current_exception());
+            }
         });
         if (!walker.joinable())
             return false;
@@ -86,10 +90,14 @@ private:
     void count(const Walk& walk, const std::stop_token& stop)
     {
         std::int64_t files = 0;
-        walk([&](const FoundFile&) {
-            ++files;
-            return !stop.stop_requested();
-        });
+        try {
+            walk([&](const FoundFile&) {
+                ++files;
+                return !stop.stop_requested();
+            });
+        } catch (const std::exception&) { // the work meets it too, and tells
+            return;
+        }
         if (!stop.stop_requested())
             progress_.setTotal(files);
     }

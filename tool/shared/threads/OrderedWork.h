@@ -9,15 +9,16 @@
 #include <chrono>
 #include <condition_variable>
 #include <deque>
+#include <exception>
 #include <functional>
 #include <mutex>
 #include <optional>
 #include <span>
 #include <vector>
 
-/// One thread gives jobs, one takes results. `work` runs on all threads at once and must not throw. As many threads are
-/// used as can be started; without any, the thread that takes results does the work. The destructor stops the threads
-/// after their current jobs.
+/// One thread gives jobs, one takes results. `work` runs on all threads at once. As many threads are used as can be
+/// started; without any, the thread that takes results does the work. The destructor stops the threads after their
+/// current jobs.
 template <class Job, class Result>
 class OrderedWork {
 public:
@@ -54,13 +55,25 @@ public:
         ready_.notify_all();
         done_.notify_all();
     }
-    /// Waits for the next result; none if all were taken.
+    /// Stops all, where an exception would leave a thread: `take` throws it.
+    void fail(std::exception_ptr problem)
+    {
+        const std::lock_guard lock(mutex_);
+        problem_ = std::move(problem);
+        stopped_ = true;
+        ready_.notify_all();
+        room_.notify_all();
+        done_.notify_all();
+    }
+    /// Waits for the next result; none if all were taken. Throws what `work` threw, or the giver failed with.
     std::optional<Result> take()
     {
         std::unique_lock lock(mutex_);
         done_.wait(lock, [this] {
-            return entries_.empty() ? closed_ : threads_.empty() || entries_.front().result.has_value();
+            return problem_ || (entries_.empty() ? closed_ : threads_.empty() || entries_.front().result.has_value());
         });
+        if (problem_)
+            std::rethrow_exception(problem_);
         if (entries_.empty())
             return std::nullopt;
         if (threads_.empty()) {
@@ -95,6 +108,14 @@ private:
     };
 
     void workUntilDone()
+    {
+        try {
+            workOnAll();
+        } catch (...) {
+            fail(std::current_exception());
+        }
+    }
+    void workOnAll()
     {
         std::unique_lock lock(mutex_);
         for (;;) {
@@ -140,6 +161,7 @@ private:
     std::size_t window_;
     bool closed_ = false;
     bool stopped_ = false;
+    std::exception_ptr problem_;
     std::function<Result(const Job&)> work_;
     std::vector<std::jthread> threads_; // last: they end before what they use
 };

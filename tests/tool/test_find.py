@@ -262,7 +262,7 @@ class Typed(CommandTest):
     """What is typed and printed, over a few made rows."""
     ROWS = [
         {"name": "Shaker_01.wav", "folder": "Loops/", "kind": "loop", "container_name": "WAVE", "tempo": 120.0, "key_note": 6, "mode": "minor", "key": "F# minor",
-         "category": "Drums", "duration_seconds": 2.0, "sample_rate": 44100.0, "channels": 2, "frames": 88200, "descriptors": "Dry, Clean"},
+         "category": "Drums", "duration_seconds": 2.0, "sample_rate": 44100.0, "channels": 2, "frames": 88200, "floating_point": 1, "descriptors": "Dry, Clean"},
         {"name": "Béla Bass.aif", "folder": "Loops/Bass/", "kind": "loop", "container_name": "AIFC", "tempo": 60.2, "key_note": 9, "mode": "both", "key": "A both",
          "category": "Bass", "artist": "Björk Öst", "duration_seconds": 90.0, "sample_rate": 48000.0, "channels": 1},
         {"name": "Interview\n2.wav", "folder": "Talk/", "kind": "recording", "container_name": "RF64", "title": "AND \"NOT\" (the) OR*", "artist": "!!!", "duration_seconds": 0.4,
@@ -387,8 +387,8 @@ class Typed(CommandTest):
 
     def test_lines_json_and_csv(self):
         record, = self.json("find", "--db", self.index, "shaker")
-        self.assertEqual({key: record[key] for key in ("path", "fileLength", "tempo", "key", "sampleRate", "descriptors", "kind")},
-                         {"path": self.root + "Loops/Shaker_01.wav", "fileLength": 1000, "tempo": 120.0, "key": "F# minor", "sampleRate": 44100, "descriptors": ["Dry", "Clean"], "kind": "loop"})
+        self.assertEqual({key: record[key] for key in ("path", "fileLength", "tempo", "key", "sampleRate", "descriptors", "kind", "floatingPoint")},
+                         {"path": self.root + "Loops/Shaker_01.wav", "fileLength": 1000, "tempo": 120.0, "key": "F# minor", "sampleRate": 44100, "descriptors": ["Dry", "Clean"], "kind": "loop", "floatingPoint": True})
         self.assertEqual(record["modified"], time.strftime("%Y-%m-%dT%H:%M:%SZ", time.gmtime(self.now - 86400)))
         record, = self.json("find", "--db", self.index, "--problem", "any")
         self.assertEqual((record["problems"], record["state"]), ([{"kind": "soundIsCut", "text": "some of it is missing"}], "damaged"))

@@ -147,7 +147,7 @@ class IndexRecords(CommandTest):
             self.assertEqual([list(point) for point in struct.iter_unpack("bb", points)], overview["points"])
 
     def test_keys_and_tempos_are_understood_as_people_write_them(self):
-        cases = {"F#m": (6, "minor", "F# minor"), "Gb major": (6, "major", "F# major"), "Bbmin": (10, "minor", None), "8A": (9, "minor", "A minor"),
+        cases = {"F#m": (6, "minor", "F# minor"), "Gb major": (6, "major", "F# major"), "Bbmin": (10, "minor", None), "8A": (9, "minor", "A minor"), "c moll": (0, "minor", None), "Take 2 - 8A": (9, "minor", None),
                  "8B": (0, "major", "C major"), "1A": (8, "minor", None), "12B": (4, "major", None), "5b": (3, "major", None),
                  "1d": (0, "major", None), "1m": (9, "minor", None), "12m": (2, "minor", None), "C": (0, "major", None), "Cb": (11, "major", None),
                  "B#": (0, "major", None), "a": (9, None, "A"), "D M": (2, "major", None), "Ebmaj": (3, "major", None), "c sharp minor": (1, "minor", None),

@@ -7,6 +7,7 @@ import pathlib
 import pty
 import re
 import shutil
+import signal
 import struct
 import subprocess
 import tempfile
@@ -20,6 +21,8 @@ KTFILES = os.environ["KTFILES"]
 # Nothing of the tests shows in the user's own folder, and runs side by side do not wait for each other.
 os.environ["KTFILES_COORDINATION"] = tempfile.mkdtemp(prefix="ktfiles-coordination-")
 os.environ.pop("COLUMNS", None)
+# A shell ignores it for what it starts in the background, and so would all that is started here.
+signal.signal(signal.SIGINT, signal.default_int_handler)
 atexit.register(shutil.rmtree, os.environ["KTFILES_COORDINATION"], ignore_errors=True)
 MEDIA = pathlib.Path(os.environ["KTFILES_MEDIA"])
 # What the command is linked to.

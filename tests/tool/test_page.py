@@ -154,6 +154,9 @@ class Written(PageTest):
             self.page(*options)
             self.assertEqual([row["name"] for row in self.data()["rows"]], names)
             self.assertIn(f"<h1>{title}</h1>", (self.folder / "library.html").read_text(encoding="utf-8"))
+        for options, status, files in (((), 1, None), (("--fresh",), 0, 2)):  # with a folder, there need be no index
+            told = self.run_command("page", "Loops/b", "--db", "new.db", "-o", "new.html", "--jsonl", *options, status=status).stdout
+            self.assertEqual(json.loads(told).get("files"), files)
 
     def test_more_rows_than_a_page_holds(self):
         made_index(self.folder / "l.db", 100_001)

@@ -1,9 +1,8 @@
 // ktfiles find: lists the files of an index that are as is asked.
 #include "tool/find/FindReport.h"
 #include "tool/shared/arguments/CommandLine.h"
-#include "tool/shared/indexing/LibraryUpdate.h"
+#include "tool/shared/indexing/FreshLibrary.h"
 #include "tool/shared/library/LibraryQueryOptions.h"
-#include "tool/shared/output/FilesProgress.h"
 #include "tool/shared/output/ProgressLine.h"
 
 #include <unistd.h>
@@ -25,20 +24,6 @@ void tellOnTerminal(const std::string& text)
     const progressline::Cleared cleared;
     if (isTerminal(STDERR_FILENO) && !Output::standard().failed())
         fmt::print(stderr, "{}\n", text);
-}
-
-/// What cannot be looked at is told, and stays in the index as it was.
-void bringUpToDate(const std::string& path, const LibraryQuery& query, bool quiet)
-{
-    using Mode = SQLDatabase::Mode;
-    Library library(path, query.scopes.empty() ? Mode::write : Mode::create);
-    LibraryUpdate update;
-    for (const LibraryQuery::Scope& scope : query.scopes)
-        update.folders.push_back(scope.path);
-    FilesProgress progress("indexing", quiet);
-    update.progress = &progress;
-    update.tell = reportFailure;
-    updateLibrary(library, update);
 }
 
 /// Returns whether a file was found.

@@ -33,7 +33,12 @@ public:
             json_.end();
         }
         walk_.emplace(inbox_, starts.walks, kRecordWalkers);
-        gather();
+        try {
+            gather();
+        } catch (const Failure&) { // for want of memory: what was written stays whole
+            json_.finish();
+            throw;
+        }
         json_.finish();
         return isGood_;
     }

@@ -4,11 +4,10 @@
 #include "tool/page/PageRow.h"
 #include "tool/page/PageServer.h"
 #include "tool/shared/arguments/CommandLine.h"
-#include "tool/shared/indexing/LibraryUpdate.h"
+#include "tool/shared/indexing/FreshLibrary.h"
 #include "tool/shared/library/IndexedName.h"
 #include "tool/shared/library/LibraryQueryOptions.h"
 #include "tool/shared/library/LibrarySearch.h"
-#include "tool/shared/output/FilesProgress.h"
 #include "tool/shared/output/JsonRecords.h"
 #include "tool/shared/output/ShownName.h"
 
@@ -159,21 +158,6 @@ bool servePage(const PageArguments& arguments, Library& library, const OutputOpt
     return true;
 }
 
-// Brings what is in the index up to date, all of it or the folders that are looked in.
-void update(const PageArguments& arguments, const std::string& path, bool quiet)
-{
-    Library library(path, SQLDatabase::Mode::write);
-    std::vector<std::string> folders;
-    for (const LibraryQuery::Scope& scope : arguments.query.scopes)
-        folders.push_back(scope.path);
-    FilesProgress progress("indexing", quiet);
-    LibraryUpdate wanted;
-    wanted.folders = std::move(folders);
-    wanted.tell = [](const std::string& name, const std::string& problem) { reportFailure(shownName(name), problem); };
-    wanted.progress = &progress;
-    updateLibrary(library, wanted);
-}
-
 bool runPage(PageArguments& arguments, const OutputOptions& options)
 {
     checkArguments(arguments, options);
@@ -183,7 +167,7 @@ bool runPage(PageArguments& arguments, const OutputOptions& options)
     return reportingRecord(path, options,
                            [&] {
                                if (arguments.updatesFirst)
-                                   update(arguments, path, options.quiet);
+                                   bringUpToDate(path, arguments.query, options.quiet);
                                Library library(path, SQLDatabase::Mode::read);
                                good = arguments.serves ? servePage(arguments, library, options)
                                                        : writePage(arguments, library, options);

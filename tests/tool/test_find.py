@@ -224,6 +224,23 @@ class AgainstAPlainFilter(CommandTest):
                     expected = self.plain.answer({**asked, "terms": [term]}, order, False, None)
                     self.assertEqual(self.found(*typed, term, "--sort", order), expected, (typed, term, order))
 
+    def test_terms_stand_within_words_of_scripts_without_spaces_and_names_may_be_taken_apart(self):
+        pieces = ["和太鼓", "アンサンブル", "ドラム", "電子音", "夜明け", "パーカッション"]
+        pick, index, names = random.Random(1), os.path.join(self.home.name, "scripts.db"), {}
+        library_rows.fill(index, 3000, seed=6)
+        with sqlite3.connect(index) as database:
+            for row, in database.execute("SELECT id FROM files").fetchall():
+                names[row] = "".join(pick.sample(pieces, 3)) + f"{row} 장구"
+                database.execute("UPDATE files SET name = ? WHERE id = ?", (unicodedata.normalize(pick.choice(["NFC", "NFD"]), names[row]), row))
+        sizes = []
+        for term in ("太鼓", "ドラム", "ラム", "鼓ア", "太鼓アンサンブル", "夜明けパーカッションドラム", "ッション電子音7", "장구", "장", "猫", "ドラム猫"):
+            expected = {name for name in names.values() if term in name}
+            sizes.append(len(expected))
+            for form in ("NFC", "NFD"):
+                found = self.run_command("find", "--db", index, "-0", unicodedata.normalize(form, term), status=None).stdout.decode().split("\0")[:-1]
+                self.assertEqual({unicodedata.normalize("NFC", path.rsplit("/", 1)[1]) for path in found}, expected, (term, form))
+        self.assertEqual((sizes[-2:], max(sizes)), ([0, 0], len(names)))
+
     def test_orders_are_gone_along_without_sorting(self):
         """What find walks along for each order is an index of the database."""
         source = (pathlib.Path(__file__).resolve().parents[2] / "tool/shared/library/QueryOrder.cpp").read_text(encoding="utf-8")

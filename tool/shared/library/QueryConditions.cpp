@@ -1,6 +1,7 @@
 #include "tool/shared/library/QueryConditions.h"
 
 #include "tool/shared/library/IndexedName.h"
+#include "tool/shared/library/SearchTerm.h"
 
 #include <fmt/format.h>
 
@@ -21,19 +22,19 @@ public:
     SameWords(const SearchTokenizer& tokenizer, const std::string& text)
         : tokenizer_(tokenizer),
           text_(text),
-          words_(tokenizer.wordsOf(text))
+          term_(tokenizer, text)
     {
     }
     bool passesText(std::string_view text) const override
     {
         tokenizer_.read(text, read_);
-        return read_ == words_ && (!words_.empty() || text == text_);
+        return term_.forms.empty() ? text == text_ : term_.equals(read_);
     }
 
 private:
     const SearchTokenizer& tokenizer_;
     std::string text_;
-    std::vector<std::string> words_;
+    SearchTerm term_;
     mutable std::vector<std::string> read_;
 };
 
@@ -105,6 +106,51 @@ std::string quotedForSearch(std::string_view text)
     return result + '"';
 }
 
+// In the language of the search, `mark` behind each form.
+std::string eitherForm(const SearchTerm& term, const char* mark)
+{
+    std::string match;
+    for (const SearchTerm::Form& form : term.forms)
+        match += (match.empty() ? "" : " OR ") + quotedForSearch(form.text) + mark;
+    return match;
+}
+
+// The words of the index that the first word of the term stands in, or ends; none for more than are worth it.
+std::optional<std::vector<std::string>> wordsWith(SQLDatabase& database, const SearchTerm::Words& words)
+{
+    constexpr std::size_t kMostWords = 500;
+    database.run("CREATE VIRTUAL TABLE IF NOT EXISTS temp.search_words USING fts5vocab(main, search, row)");
+    SQLStatement statement(database, "SELECT term FROM temp.search_words WHERE instr(term, ?)");
+    std::vector<std::string> found;
+    for (statement.bind(1, std::string_view(words.front())); statement.step();) {
+        const std::string word = statement.text(0);
+        if (words.size() > 1 && !word.ends_with(words.front()))
+            continue;
+        if (found.size() == kMostWords)
+            return std::nullopt;
+        found.push_back(word);
+    }
+    return found;
+}
+
+// The search knows beginnings of words only, so that whole ones stand in place of the first of the term. Empty if there
+// are none; none for more than are worth it.
+std::optional<std::string> withinWords(SQLDatabase& database, const SearchTerm& term)
+{
+    std::string match;
+    for (const SearchTerm::Form& form : term.forms) {
+        const auto found = wordsWith(database, form.words);
+        if (!found)
+            return std::nullopt;
+        for (std::string phrase : *found) {
+            for (std::size_t i = 1; i < form.words.size(); ++i)
+                phrase += " " + form.words[i];
+            match += (match.empty() ? "" : " OR ") + quotedForSearch(phrase) + (form.words.size() > 1 ? " *" : "");
+        }
+    }
+    return match;
+}
+
 } // namespace
 
 int SQLText::bindTo(SQLStatement& statement, int first) const
@@ -150,7 +196,7 @@ QueryConditions::QueryConditions(SQLDatabase& database, const SearchTokenizer& t
     addText("f.artist", query.artist);
     addText("f.title", query.title);
     addText("f.album", query.album);
-    addTextSelections(query);
+    addTextSelections(database, query);
 }
 
 // The index by keys goes on with tempos, so that both together select few rows.
@@ -170,21 +216,31 @@ void QueryConditions::addMusic(const LibraryQuery& query)
     addIndexed(!both.empty() ? both : keys.empty() ? tempos : keys);
 }
 
-void QueryConditions::addTextSelections(const LibraryQuery& query)
+void QueryConditions::addTextSelections(SQLDatabase& database, const LibraryQuery& query)
 {
     std::string words, letters;
-    const auto add = [](std::string& match, const std::string& text, const char* mark) {
-        match += (match.empty() ? "" : " AND ") + quotedForSearch(text) + mark;
+    const auto add = [](std::string& match, const std::string& further) {
+        match += (match.empty() ? "(" : " AND (") + further + ")";
     };
     for (const std::string* const text : {&query.category, &query.genre, &query.artist, &query.title, &query.album})
-        if (!tokenizer_.wordsOf(*text).empty())
-            add(words, *text, "");
-    for (const std::string& term : query.terms) {
-        const auto wordsOfTerm = tokenizer_.wordsOf(term);
-        if (wordsOfTerm.empty()) // a dash beyond ASCII is no word
+        if (const SearchTerm term(tokenizer_, *text); !term.forms.empty())
+            add(words, eitherForm(term, ""));
+    for (const std::string& typed : query.terms) {
+        const SearchTerm term(tokenizer_, indexedName(typed));
+        if (term.isWithinWords) {
+            const auto match = withinWords(database, term);
+            selectsAllTerms_ = selectsAllTerms_ && match;
+            if (match && match->empty())
+                return addIndexed({{"0", {}}});
+            if (match)
+                add(words, *match);
+            continue;
+        }
+        if (term.forms.empty()) // a dash beyond ASCII is no word
             return addIndexed({{"0", {}}});
-        const bool isLetter = wordsOfTerm.size() == 1 && wordsOfTerm.front().size() == 1;
-        add(isLetter ? letters : words, indexedName(term), " *"); // the last word may be begun only
+        const SearchTerm::Words& first = term.forms.front().words;
+        const bool isLetter = first.size() == 1 && first.front().size() == 1;
+        add(isLetter ? letters : words, eitherForm(term, " *")); // the last word may be begun only
     }
     for (const std::string& match : {words, letters})
         if (!match.empty())

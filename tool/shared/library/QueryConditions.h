@@ -36,13 +36,15 @@ public:
     /// The rows that have all terms, and all words of the texts that are asked for; empty without either. The second of
     /// two is for terms of a letter alone, which begins so many words that it takes long.
     const std::vector<SQLText>& textSelections() const { return textSelections_; }
+    /// Whether these leave no term out. Rows without one that is left out must be looked for in their texts.
+    bool selectsAllTerms() const { return selectsAllTerms_; }
     /// The scope if there is one alone, as a condition on `folders d`; else empty.
     const SQLText& ofFolder() const { return ofFolder_; }
 
 private:
     void addText(const char* column, const std::string& text);
     void addCategory(const std::string& category);
-    void addTextSelections(const LibraryQuery& query);
+    void addTextSelections(SQLDatabase& database, const LibraryQuery& query);
     void addScopes(SQLDatabase& database, const LibraryQuery& query);
     void addForms(const LibraryQuery& query);
     void addMusic(const LibraryQuery& query);
@@ -55,5 +57,6 @@ private:
     const SearchTokenizer& tokenizer_;
     SQLText ofRow_, ofFolder_;
     std::vector<SQLText> selections_, textSelections_;
+    bool selectsAllTerms_ = true;
     std::vector<std::unique_ptr<SQLTest>> tests_;
 };

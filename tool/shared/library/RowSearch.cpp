@@ -170,7 +170,7 @@ std::optional<RowSet> RowSearch::selectedRows()
     bool areTextsTaken = true;
     for (const SQLText& selection : conditions_.textSelections())
         areTextsTaken = areTextsTaken && (!chosen || chosen->size() > effort_.readTexts) && take(selection, kAll);
-    areTermsMet_ = areTermsMet_ || areTextsTaken;
+    areTermsMet_ = areTermsMet_ || (areTextsTaken && conditions_.selectsAllTerms());
     for (const SQLText* const selection : left)
         if (!chosen || chosen->size() > effort_.sortedRows)
             take(*selection, kAll);

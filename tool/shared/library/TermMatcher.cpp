@@ -1,5 +1,7 @@
 #include "tool/shared/library/TermMatcher.h"
 
+#include "tool/shared/library/IndexedName.h"
+
 #include <algorithm>
 #include <iterator>
 
@@ -18,7 +20,7 @@ TermMatcher::TermMatcher(SQLDatabase& database, const SearchTokenizer& tokenizer
 {
     static_assert(std::size(kWeights) == kTexts);
     for (const std::string& term : terms)
-        terms_.push_back(tokenizer.wordsOf(term));
+        terms_.emplace_back(tokenizer, indexedName(term));
 }
 
 std::optional<int> TermMatcher::relevanceOf(std::int64_t file)
@@ -29,29 +31,15 @@ std::optional<int> TermMatcher::relevanceOf(std::int64_t file)
         tokenizer_.read(texts_.bytes(text), words_[static_cast<std::size_t>(text)]);
     texts_.reset();
     int relevance = 0;
-    for (const Words& term : terms_) {
+    for (const SearchTerm& term : terms_) {
         int best = 0;
         for (int text = 0; text < kTexts; ++text)
-            best = std::max(best, relevanceIn(text, term));
+            if (const auto match = term.matchIn(words_[static_cast<std::size_t>(text)]);
+                match != SearchTerm::Match::none)
+                best = std::max(best, kWeights[text] + (match == SearchTerm::Match::whole ? kWholeWord : 0));
         if (best == 0)
             return std::nullopt;
         relevance += best;
     }
     return relevance;
-}
-
-// A term's last word may be begun only.
-int TermMatcher::relevanceIn(int text, const Words& term) const
-{
-    const Words& words = words_[static_cast<std::size_t>(text)];
-    const int weight = kWeights[text];
-    int best = 0;
-    for (std::size_t start = 0; !term.empty() && start + term.size() <= words.size(); ++start) {
-        const std::string& last = words[start + term.size() - 1];
-        if (!last.starts_with(term.back()) ||
-            !std::equal(term.begin(), term.end() - 1, words.begin() + static_cast<std::ptrdiff_t>(start)))
-            continue;
-        best = std::max(best, weight + (last.size() == term.back().size() ? kWholeWord : 0));
-    }
-    return best;
 }

@@ -2,7 +2,7 @@
 #pragma once
 
 #include "tool/shared/library/SQLDatabase.h"
-#include "tool/shared/library/SearchTokenizer.h"
+#include "tool/shared/library/SearchTerm.h"
 
 #include <cstdint>
 #include <optional>
@@ -20,13 +20,10 @@ public:
     std::optional<int> relevanceOf(std::int64_t file);
 
 private:
-    using Words = std::vector<std::string>;
     static constexpr int kTexts = 7; // the columns of `search`
 
-    int relevanceIn(int text, const Words& term) const;
-
     const SearchTokenizer& tokenizer_;
-    std::vector<Words> terms_;
+    std::vector<SearchTerm> terms_;
     SQLStatement texts_;
-    std::vector<Words> words_; // of each text of one file
+    std::vector<SearchTerm::Words> words_; // of each text of one file
 };

@@ -4,6 +4,7 @@
 #include "tool/shared/indexing/UpdateStarts.h"
 #include "tool/shared/library/IndexedName.h"
 #include "tool/shared/library/LibraryRecordJson.h"
+#include "tool/shared/output/Failure.h"
 #include "tool/shared/output/FilesProgress.h"
 #include "tool/shared/output/JsonRecords.h"
 

@@ -1,6 +1,7 @@
 #include "tool/shared/indexing/FreshLibrary.h"
 
 #include "tool/shared/indexing/LibraryUpdate.h"
+#include "tool/shared/output/Failure.h"
 #include "tool/shared/output/FilesProgress.h"
 
 void bringUpToDate(const std::string& path, const LibraryQuery& query, bool quiet)

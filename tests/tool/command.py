@@ -6,6 +6,7 @@ import os
 import pathlib
 import pty
 import re
+import resource
 import shutil
 import signal
 import struct
@@ -75,6 +76,15 @@ class CommandTest(unittest.TestCase):
         if (shape := schemas.shape_of(arguments)) and result.stdout:
             schemas.check(arguments, result.stdout, shape)
         return result
+
+    def with_little_memory(self, *arguments):
+        """The results with more and more memory, from where the system can load the command."""
+        for megabytes in range(40, 141, 10):
+            def limit(size=megabytes << 20):
+                resource.setrlimit(resource.RLIMIT_AS, (size, size))
+            result = subprocess.run([KTFILES, *arguments], cwd=self.folder, capture_output=True, text=True, preexec_fn=limit, timeout=60)
+            if result.returncode != 127:
+                yield result
 
     def without_decoders(self):
         """An environment in which no decoder module lies beside the library."""

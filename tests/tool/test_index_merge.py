@@ -234,7 +234,11 @@ class MergeTest(CommandTest):
         sqlite3.connect(self.folder / "other.db").execute("CREATE TABLE files(id)").connection.close()
         self.write("cut.db", before[:len(before) // 2])
         (self.folder / "folder").mkdir()
-        for name, words in (("all.db", "is the index that the others go into"), ("link.db", "is the index that the others go into"),
+        open_elsewhere = sqlite3.connect(self.folder / "all.db")  # so that SQLite's files are beside it
+        self.addCleanup(open_elsewhere.close)
+        open_elsewhere.execute("SELECT count(*) FROM files").fetchall()
+        for name, words in (("all.db-wal", "is the index that the others go into"), ("all.db-shm", "is the index that the others go into"),
+                            ("all.db", "is the index that the others go into"), ("link.db", "is the index that the others go into"),
                             ("newer.db", "newer ktfiles"), ("other.db", "is no index"), ("cut.db", "damaged"), ("folder", "is a folder")):
             with self.subTest(name):
                 self.assertIn(words, self.merge(name, status=1).stderr.decode())

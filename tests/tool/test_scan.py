@@ -95,12 +95,9 @@ class Scan(CommandTest):
         for number in range(20_000):
             self.write(f"lib/{number:05}{'x' * 220}", b"")
         told = set()
-        for megabytes in range(40, 141, 10):
-            def limit(bytes=megabytes << 20):
-                resource.setrlimit(resource.RLIMIT_AS, (bytes, bytes))
-            for verb in ("scan", "info"):
-                result = subprocess.run([KTFILES, verb, "lib", "-j", "2", "-q"], cwd=self.folder, capture_output=True, text=True, preexec_fn=limit, timeout=60)
-                self.assertIn(result.returncode, (0, 1, 127), (verb, megabytes, result.stderr))  # 127: the system cannot load the command
+        for verb in ("scan", "info"):
+            for result in self.with_little_memory(verb, "lib", "-j", "2", "-q"):
+                self.assertIn(result.returncode, (0, 1), (verb, result.stderr))
                 told.add(result.stderr)
         self.assertIn("ktfiles: error: out of memory\n", told)
 

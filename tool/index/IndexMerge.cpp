@@ -16,8 +16,10 @@
 #include <fmt/format.h>
 
 #include <algorithm>
+#include <array>
 #include <optional>
 #include <sys/stat.h>
+#include <unistd.h>
 
 namespace {
 
@@ -72,7 +74,6 @@ public:
     void add(const std::string& source, InputLines& lines, bool isDatabase)
     {
         progress_.begin(source);
-        requireOther(lines.descriptor());
         if (isDatabase)
             addDatabase(source);
         else
@@ -84,14 +85,6 @@ public:
     const MergeCounts& counts() const { return merge_.counts(); }
 
 private:
-    void requireOther(int descriptor) const
-    {
-        struct stat source = {}, target = {};
-        if (::fstat(descriptor, &source) == 0 && ::stat(target_.path().c_str(), &target) == 0 &&
-            source.st_dev == target.st_dev && source.st_ino == target.st_ino)
-            throw Failure("is the index that the others go into");
-    }
-
     void addDatabase(const std::string& source)
     {
         Library library(source, SQLDatabase::Mode::read);
@@ -191,6 +184,19 @@ private:
     JsonRecords json_;
 };
 
+// Whether it is the index itself, or a file beside it that SQLite made. Another descriptor of such a file must not be
+// closed: with it go the locks of this process.
+bool isPartOf(const std::string& index, const std::string& source)
+{
+    struct stat status = {}, part = {};
+    if ((source == kStandardInput ? ::fstat(STDIN_FILENO, &status) : ::stat(source.c_str(), &status)) != 0)
+        return false;
+    return std::ranges::any_of(std::array{"", "-wal", "-shm"}, [&](const char* ending) {
+        return ::stat((index + ending).c_str(), &part) == 0 && part.st_dev == status.st_dev &&
+               part.st_ino == status.st_ino;
+    });
+}
+
 class MergeRun {
 public:
     MergeRun(const MergeArguments& arguments, const OutputOptions& options)
@@ -218,6 +224,8 @@ private:
     /// The index is made for the first source that can be read, and not for none.
     void open(const std::string& source)
     {
+        if (isPartOf(path_, source))
+            return fail(source, "is the index that the others go into");
         std::optional<InputLines> lines;
         bool isDatabase = false;
         try {

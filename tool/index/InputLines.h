@@ -20,8 +20,6 @@ public:
     std::size_t number() const { return number_; }
     /// Whether the text begins so; before the first line only, and for few bytes.
     bool beginsWith(std::string_view bytes);
-    /// The descriptor, for its status.
-    int descriptor() const { return descriptor_; }
 
 private:
     /// False at the end of the input.

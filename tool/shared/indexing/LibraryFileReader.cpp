@@ -8,6 +8,7 @@
 #include "tool/shared/description/FoundProblems.h"
 #include "tool/shared/indexing/BoundedText.h"
 #include "tool/shared/indexing/FieldTexts.h"
+#include "tool/shared/indexing/FolderListing.h"
 #include "tool/shared/indexing/LoopTagColumns.h"
 #include "tool/shared/indexing/SoundColumns.h"
 #include "tool/shared/indexing/SoundPass.h"
@@ -18,7 +19,7 @@
 
 #include <chrono>
 #include <ctime>
-#include <sys/stat.h>
+#include <thread>
 
 namespace {
 
@@ -29,19 +30,26 @@ constexpr std::chrono::seconds kQuick{1};         // what took longer is not rea
 constexpr int kMostReadings = 3;                  // of a file that changes while it is read
 constexpr std::size_t kMostOfProblem = 1024;      // bytes of a text
 
-std::int64_t inNanoseconds(const timespec& time)
+// A change within a tick of the clock leaves the time as it is. The system's ticks are 1 to 10 ms; a time in whole
+// hundredths of a second may be that of a file system that counts in seconds, two of them on FAT.
+constexpr std::chrono::milliseconds kTick{20};
+constexpr std::chrono::seconds kLongTick{3};
+constexpr std::int64_t kHundredth = 10'000'000; // in nanoseconds
+
+std::chrono::nanoseconds sinceChange(const SeenStamp& stamp)
 {
-    return std::int64_t{time.tv_sec} * 1'000'000'000 + time.tv_nsec;
+    return std::chrono::system_clock::now().time_since_epoch() - std::chrono::nanoseconds(stamp.changed);
 }
 
-/// None for a file that is not there.
-std::optional<SeenStamp> stampOf(const std::string& path)
+/// Whether a later change would show in the stamp. Waits for the end of a short tick, not of a long one.
+bool showsChanges(const SeenStamp& stamp)
 {
-    struct stat status = {};
-    if (::stat(path.c_str(), &status) != 0)
-        return std::nullopt;
-    return SeenStamp{status.st_size, inNanoseconds(status.st_mtim), inNanoseconds(status.st_ctim),
-                     static_cast<std::int64_t>(status.st_ino)};
+    const auto age = sinceChange(stamp);
+    if (age < std::chrono::nanoseconds::zero()) // by another clock
+        return true;
+    if (age < kTick)
+        std::this_thread::sleep_for(kTick - age);
+    return age > kLongTick || stamp.changed % kHundredth != 0;
 }
 
 // Reads one file once.
@@ -73,6 +81,12 @@ public:
     }
     /// Whether it was read to its end, as far as that can be.
     bool isComplete() const { return isComplete_; }
+    /// Whether it had the size and time of the stamp when it was opened. The system changes these one after the other,
+    /// so that a file that is written may look the same before and after.
+    bool wasOpenedAs(const SeenStamp& stamp) const
+    {
+        return !atOpen_ || *atOpen_ == FileStamp{stamp.size, stamp.changed};
+    }
 
 private:
     void readAll()
@@ -95,6 +109,7 @@ private:
             requireOK(status);
         }
         isOpen_ = true;
+        atOpen_ = file.StampAtOpen();
         describeOpened(file, path_);
         addSound(record_, file.Info());
         addProblems(file);
@@ -187,6 +202,7 @@ private:
     const std::int64_t size_;
     const LibraryReading& wanted_;
     bool isOpen_ = false, isComplete_ = true;
+    std::optional<FileStamp> atOpen_;
     LibraryRecord record_;
 };
 
@@ -198,17 +214,19 @@ std::optional<LibraryRecord> readLibraryRecord(const FilePlace& place, const See
     const auto begin = std::chrono::steady_clock::now();
     SeenStamp before = stamp;
     for (int reading = 1;; ++reading) {
+        const bool isProof = showsChanges(before);
         LibraryFileReading file(place, before.size, wanted);
         auto record = file.read();
-        const auto after = stampOf(place.path());
+        const auto after = stampOfFile(place.path());
         if (!record || !after)
             return std::nullopt;
         record->stamp = *after;
         record->indexed = std::time(nullptr);
-        if (*after == before && file.isComplete())
+        const bool isSame = *after == before && file.wasOpenedAs(before);
+        if (isSame && isProof && file.isComplete())
             return record;
         const bool isLast = reading == kMostReadings || std::chrono::steady_clock::now() - begin > kQuick;
-        if (isLast || !file.isComplete()) {
+        if (isSame || isLast || !file.isComplete()) {
             record->stamp.changed = record->stamp.inode = 0;
             return record;
         }

@@ -157,6 +157,12 @@ void UpdateBatch::finish(const std::vector<std::string>& complete, const std::ve
     for (const std::string& path : gone)
         writer_.removeRoot(path);
     writer_.commit(transaction);
-    if (!changes_.areNone())
-        library_.database().run("PRAGMA optimize; PRAGMA wal_checkpoint(PASSIVE)");
+    if (changes_.areNone())
+        return;
+    {
+        SQLTransaction alone(library_.database()); // beside a writer, it would be refused without any wait
+        library_.database().run("PRAGMA optimize");
+        alone.commit();
+    }
+    library_.database().run("PRAGMA wal_checkpoint(PASSIVE)");
 }

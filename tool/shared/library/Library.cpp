@@ -4,11 +4,17 @@
 #include "tool/shared/library/LibrarySchema.h"
 #include "tool/shared/library/SQLFailure.h"
 
+#include <chrono>
 #include <filesystem>
+#include <sqlite3.h>
 #include <system_error>
+#include <thread>
 #include <unistd.h>
 
 namespace {
+
+constexpr std::chrono::seconds kPatience{60};
+constexpr std::chrono::milliseconds kPause{5};
 
 // Only the user may look into the folder, as with other data of the desktop. A folder that the user names is not made:
 // it may be misspelled, or a volume that is not mounted.
@@ -36,6 +42,22 @@ SQLDatabase opened(const std::string& path, SQLDatabase::Mode mode)
     return SQLDatabase(path, mode);
 }
 
+// Of programs that begin at once, SQLite tells one without patience that another is busy, lest both wait for each
+// other.
+void useWriteAheadLog(SQLDatabase& database)
+{
+    const auto end = std::chrono::steady_clock::now() + kPatience;
+    for (;;) {
+        try {
+            return database.run("PRAGMA journal_mode = WAL");
+        } catch (const SQLFailure& failure) {
+            if (failure.code() != SQLITE_BUSY || std::chrono::steady_clock::now() > end)
+                throw;
+        }
+        std::this_thread::sleep_for(kPause);
+    }
+}
+
 } // namespace
 
 std::string defaultLibrary()
@@ -49,7 +71,8 @@ Library::Library(const std::string& path, SQLDatabase::Mode mode) : database_(op
         requireLibrary(database_);
     } else {
         prepareLibrary(database_); // looks at the version before anything is written
-        database_.run("PRAGMA journal_mode = WAL; PRAGMA synchronous = NORMAL; PRAGMA foreign_keys = ON");
+        useWriteAheadLog(database_);
+        database_.run("PRAGMA synchronous = NORMAL; PRAGMA foreign_keys = ON");
     }
     if (mode == SQLDatabase::Mode::read) // pages come from the system's cache without a copy; two gigabytes at most
         database_.run("PRAGMA mmap_size = 2147483648");

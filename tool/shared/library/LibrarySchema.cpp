@@ -214,7 +214,7 @@ bool isEmpty(SQLDatabase& database)
     return database.number("SELECT count(*) FROM sqlite_schema") == 0;
 }
 
-// 0 for a database without tables.
+// 0 for a database without tables. Several questions, to be asked of one state.
 std::int64_t versionOf(SQLDatabase& database)
 {
     const std::int64_t application = database.number("PRAGMA application_id");
@@ -228,6 +228,12 @@ std::int64_t versionOf(SQLDatabase& database)
     return version;
 }
 
+std::int64_t versionNow(SQLDatabase& database)
+{
+    const SQLSnapshot snapshot(database); // another program may be making it
+    return versionOf(database);
+}
+
 } // namespace
 
 std::int64_t libraryVersion()
@@ -237,7 +243,7 @@ std::int64_t libraryVersion()
 
 void prepareLibrary(SQLDatabase& database)
 {
-    if (versionOf(database) == libraryVersion())
+    if (versionNow(database) == libraryVersion())
         return;
     SQLTransaction transaction(database);
     for (std::int64_t version = versionOf(database); version < libraryVersion(); ++version) // another may have done it
@@ -249,7 +255,7 @@ void prepareLibrary(SQLDatabase& database)
 
 void requireLibrary(SQLDatabase& database)
 {
-    const std::int64_t version = versionOf(database);
+    const std::int64_t version = versionNow(database);
     if (version == 0)
         throw Failure("is an empty index; ktfiles index FOLDER fills it");
     if (version < libraryVersion())

@@ -13,6 +13,9 @@ namespace {
 
 // How long a writer waits for another one. Transactions of an index are short.
 constexpr int kPatienceMilliseconds = 60'000;
+// Each transaction of an indexer changes the schema and changes it back. SQLite follows, but fails if that happens once
+// more while it opens the table of words.
+constexpr int kMostSchemaChanges = 50;
 
 int flagsOf(SQLDatabase::Mode mode)
 {
@@ -143,8 +146,10 @@ void requireBound(sqlite3_stmt* statement, int code)
 SQLStatement::SQLStatement(const SQLDatabase& database, std::string_view sql)
 {
     sqlite3_stmt* statement = nullptr;
-    const int code = sqlite3_prepare_v3(database.handle(), sql.data(), static_cast<int>(sql.size()),
-                                        SQLITE_PREPARE_PERSISTENT, &statement, nullptr);
+    int code = SQLITE_SCHEMA;
+    for (int i = 0; code == SQLITE_SCHEMA && i < kMostSchemaChanges; ++i)
+        code = sqlite3_prepare_v3(database.handle(), sql.data(), static_cast<int>(sql.size()),
+                                  SQLITE_PREPARE_PERSISTENT, &statement, nullptr);
     if (code != SQLITE_OK)
         failForSQL(database.handle(), code);
     statement_.reset(statement);
@@ -193,7 +198,11 @@ SQLStatement& SQLStatement::bindTest(int parameter, const SQLTest& test)
 
 bool SQLStatement::step()
 {
-    const int code = sqlite3_step(statement_.get());
+    int code = sqlite3_step(statement_.get());
+    for (int i = 0; code == SQLITE_SCHEMA && i < kMostSchemaChanges; ++i) {
+        sqlite3_reset(statement_.get());
+        code = sqlite3_step(statement_.get());
+    }
     if (code == SQLITE_ROW)
         return true;
     if (code != SQLITE_DONE) {

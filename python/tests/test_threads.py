@@ -161,8 +161,8 @@ soundfile.write(path, numpy.zeros((1, 1)), 44100, subtype="PCM_16")
 size = 2**31
 with open(path, "r+b") as f:
     f.seek(4); f.write((36 + size).to_bytes(4, "little")); f.seek(40); f.write(size.to_bytes(4, "little")); f.truncate(44 + size)
-signal.setitimer(signal.ITIMER_REAL, 0.02)
 signal.signal(signal.SIGALRM, signal.default_int_handler)
+signal.setitimer(signal.ITIMER_REAL, 0.02)
 started = time.monotonic()
 try:
     for _ in range(1000):

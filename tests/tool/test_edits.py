@@ -249,25 +249,35 @@ class Interruptions(CommandTest):
         self.assertEqual(sorted(ids[4:]), [f"n{i:03}" for i in range(12)])
         self.assert_no_litter("a.wav")
 
-    def slow_edit(self, *arguments):
-        """An edit of a file so large that it can be caught while it copies, and its process."""
+    def stopped_edit(self, *arguments):
+        """A large file, and the process of an edit of it that was stopped before it replaces the file; it goes on by SIGCONT."""
         path = self.folder / "big.wav"
-        if not path.exists():
+        for _ in range(20):
             path.write_bytes(wave(frames=100_000_000))
-        edit = subprocess.Popen([KTFILES, "chunks", "add", "big.wav", "note", "-q", *arguments], cwd=self.folder,
-                                stdin=subprocess.DEVNULL, stderr=subprocess.PIPE)
-        self.addCleanup(edit.communicate)
-        while edit.poll() is None and len(os.listdir(self.folder)) == 1:
-            time.sleep(0.001)
-        return path, edit
+            edit = subprocess.Popen([KTFILES, "chunks", "add", "big.wav", "note", "-q", *arguments], cwd=self.folder,
+                                    stdin=subprocess.DEVNULL, stderr=subprocess.PIPE)
+            self.addCleanup(edit.communicate)
+            copy = self.folder / ".big.wav.ktfiles-0"
+            while edit.poll() is None and not copy.exists():
+                time.sleep(0.001)
+            edit.send_signal(signal.SIGSTOP)
+            if os.waitid(os.P_PID, edit.pid, os.WSTOPPED | os.WEXITED | os.WNOWAIT).si_code == os.CLD_STOPPED and copy.exists():
+                return path, edit
+            edit.send_signal(signal.SIGCONT)  # it was faster than we are
+            edit.wait(60)
+        self.fail("no edit could be stopped")
+
+    def goes_on(self, edit, *signals):
+        for number in (*signals, signal.SIGCONT):
+            edit.send_signal(number)
 
     def test_signals_and_kills(self):
         for signal_number in (signal.SIGINT, signal.SIGTERM, signal.SIGHUP):
-            path, edit = self.slow_edit()
-            edit.send_signal(signal_number)
+            path, edit = self.stopped_edit()
+            self.goes_on(edit, signal_number)
             self.assertEqual(edit.wait(30), -signal_number)
             self.assert_no_litter("big.wav")
-        path, edit = self.slow_edit()
+        path, edit = self.stopped_edit()
         edit.kill()
         edit.wait(30)
         self.assertEqual(len(os.listdir(self.folder)), 2)  # nothing can be done about that one but
@@ -278,20 +288,22 @@ class Interruptions(CommandTest):
         self.assert_no_litter("big.wav", foreign.name)
 
     def test_a_name_that_is_given_away_leads_no_edit_astray(self):
-        path, edit = self.slow_edit()
+        path, edit = self.stopped_edit()
         victim = self.write("victim", wave())
         name = self.folder / ".big.wav.ktfiles-0"
         os.rename(name, self.folder / "moved")
         name.symlink_to("victim")
+        self.goes_on(edit)
         self.assertIn(b"was moved by another program", edit.communicate(timeout=60)[1])
         self.assertEqual(victim.read_bytes(), wave())
         self.assertEqual(path.stat().st_size, len(wave()) - 200 + 200_000_000)
 
     def test_change_by_others_meanwhile(self):
-        path, edit = self.slow_edit()
+        path, edit = self.stopped_edit()
         with open(path, "r+b") as file:
             file.seek(60)
             file.write(b"played on")
+        self.goes_on(edit)
         self.assertIn(b"changed by another program", edit.communicate(timeout=30)[1])
         self.assertEqual(edit.returncode, 1)
         with open(path, "rb") as file:

@@ -300,7 +300,7 @@ class Bulk(CommandTest):
         self.assertEqual((self.folder / "c.aiff").read_bytes(), before)
 
     def test_an_interrupt_is_told_and_leaves_whole_files(self):
-        names = [f"{i:03}.wav" for i in range(300)]
+        names = [f"{i:04}.wav" for i in range(2000)]  # which takes so long that it is interrupted in between
         old = wave(chunk(b"bext", bext(b"old")))
         for name in names:
             self.write(name, old)

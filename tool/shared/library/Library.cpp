@@ -13,8 +13,7 @@
 
 namespace {
 
-constexpr std::chrono::seconds kPatience{60};
-constexpr std::chrono::milliseconds kPause{5};
+constexpr std::chrono::milliseconds kPause{5}; // between two tries
 
 // Only the user may look into the folder, as with other data of the desktop. A folder that the user names is not made:
 // it may be misspelled, or a volume that is not mounted.
@@ -46,7 +45,7 @@ SQLDatabase opened(const std::string& path, SQLDatabase::Mode mode)
 // other.
 void useWriteAheadLog(SQLDatabase& database)
 {
-    const auto end = std::chrono::steady_clock::now() + kPatience;
+    const auto end = std::chrono::steady_clock::now() + kSQLPatience;
     for (;;) {
         try {
             return database.run("PRAGMA journal_mode = WAL");

@@ -11,8 +11,6 @@
 
 namespace {
 
-// How long a writer waits for another one. Transactions of an index are short.
-constexpr int kPatienceMilliseconds = 60'000;
 // Each transaction of an indexer changes the schema and changes it back. SQLite follows, but fails if that happens once
 // more while it opens the table of words.
 constexpr int kMostSchemaChanges = 50;
@@ -103,7 +101,7 @@ SQLDatabase::SQLDatabase(const std::string& path, Mode mode) : path_(path)
     handle_.reset(handle);
     if (code != SQLITE_OK)
         failForSQL(handle, code);
-    sqlite3_busy_timeout(handle, kPatienceMilliseconds);
+    sqlite3_busy_timeout(handle, static_cast<int>(kSQLPatience.count()));
 }
 
 void SQLDatabase::run(const std::string& sql)

@@ -3,6 +3,7 @@
 
 #include "tool/shared/library/SQLTest.h"
 
+#include <chrono>
 #include <cstdint>
 #include <memory>
 #include <optional>
@@ -11,6 +12,9 @@
 
 struct sqlite3;
 struct sqlite3_stmt;
+
+/// How long a connection waits for others that write. Transactions of an index are short.
+inline constexpr std::chrono::milliseconds kSQLPatience{60'000};
 
 /// Owns the connection. Operations throw SQLFailure. One thread at a time.
 class SQLDatabase {

@@ -261,8 +261,10 @@ class Interruptions(CommandTest):
             while edit.poll() is None and not copy.exists():
                 time.sleep(0.001)
             edit.send_signal(signal.SIGSTOP)
-            if os.waitid(os.P_PID, edit.pid, os.WSTOPPED | os.WEXITED | os.WNOWAIT).si_code == os.CLD_STOPPED and copy.exists():
-                return path, edit
+            if edit.returncode is None:
+                state = os.waitid(os.P_PID, edit.pid, os.WSTOPPED | os.WEXITED | os.WNOWAIT).si_code
+                if state == os.CLD_STOPPED and copy.exists():
+                    return path, edit
             edit.send_signal(signal.SIGCONT)  # it was faster than we are
             edit.wait(60)
         self.fail("no edit could be stopped")
